@@ -1,0 +1,36 @@
+// Opens files in the one way that suits a library which runs as root: close-on-exec, EINTR retried, never waiting for
+// the other end of a FIFO that somebody left where a settings file belongs.
+#ifndef TAVO_CORE_DETAIL_OPEN_FILE_H
+#define TAVO_CORE_DETAIL_OPEN_FILE_H
+
+#include "core/detail/owner.h"
+
+#include <string_view>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+
+namespace tavo {
+
+// open(2) with O_CLOEXEC, O_NOCTTY and O_NONBLOCK added; empty with errno on failure.
+Fd OpenFd(const char *path, int flags, mode_t mode = 0666) noexcept;
+
+// The same for a regular file only: EISDIR for a directory, EINVAL for anything else that is no regular file.
+Fd OpenRegular(const char *path, int flags, mode_t mode = 0666) noexcept;
+
+// A read stream on a regular file; empty with errno on failure.
+File OpenToRead(const char *path) noexcept;
+
+// True when everybody may create names in the directory that holds `path`, as in /tmp: there a link or a foreign file
+// may be a trap. False when the directory cannot be looked at.
+bool IsInPublicDirectory(const char *path);
+
+// Writes all of `text`; EINTR and short writes are retried.
+bool WriteAll(int fd, std::string_view text) noexcept;
+
+// fsync, retried on EINTR; true also for what has no disk behind it (a terminal, a pipe).
+bool SyncFd(int fd) noexcept;
+
+}  // namespace tavo
+
+#endif

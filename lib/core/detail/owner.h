@@ -1,0 +1,108 @@
+// Owners of what must be given back: one class a resource. Their destructors keep errno, because they run between a
+// failed call and the report that reads it.
+#ifndef TAVO_CORE_DETAIL_OWNER_H
+#define TAVO_CORE_DETAIL_OWNER_H
+
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+#include <memory>
+#include <utility>
+
+#include <unistd.h>
+
+namespace tavo {
+
+class KeepErrno {
+  public:
+    KeepErrno() noexcept = default;
+    ~KeepErrno() { errno = saved_; }
+    KeepErrno(const KeepErrno &) = delete;
+    KeepErrno &operator=(const KeepErrno &) = delete;
+
+  private:
+    int saved_ = errno;
+};
+
+// A file descriptor.
+class Fd {
+  public:
+    Fd() noexcept = default;
+    explicit Fd(int fd) noexcept : fd_(fd) {}
+    Fd(Fd &&other) noexcept : fd_(other.Release()) {}
+    Fd &operator=(Fd &&other) noexcept
+    {
+        if (this != &other)
+            Reset(other.Release());
+        return *this;
+    }
+    ~Fd() { Reset(); }
+
+    explicit operator bool() const noexcept { return fd_ >= 0; }
+    int Get() const noexcept { return fd_; }
+    int Release() noexcept { return std::exchange(fd_, -1); }
+
+    void Reset(int fd = -1) noexcept
+    {
+        KeepErrno keep;
+        if (fd_ >= 0)
+            ::close(fd_);
+        fd_ = fd;
+    }
+
+    // Closes and tells whether the kernel took everything that was written.
+    bool Close() noexcept { return fd_ < 0 || ::close(Release()) == 0; }
+
+  private:
+    int fd_ = -1;
+};
+
+// A stdio stream.
+class File {
+  public:
+    File() noexcept = default;
+    explicit File(std::FILE *stream) noexcept : stream_(stream) {}
+    File(File &&other) noexcept : stream_(other.Release()) {}
+    File &operator=(File &&other) noexcept
+    {
+        if (this != &other)
+            Reset(other.Release());
+        return *this;
+    }
+    ~File() { Reset(); }
+
+    explicit operator bool() const noexcept { return stream_ != nullptr; }
+    std::FILE *Get() const noexcept { return stream_; }
+    std::FILE *Release() noexcept { return std::exchange(stream_, nullptr); }
+    int Descriptor() const noexcept { return ::fileno(stream_); }
+
+    void Reset(std::FILE *stream = nullptr) noexcept
+    {
+        KeepErrno keep;
+        if (stream_)
+            std::fclose(stream_);
+        stream_ = stream;
+    }
+
+    // Flushes, closes and tells whether everything was written.
+    bool Close() noexcept { return !stream_ || std::fclose(Release()) == 0; }
+
+  private:
+    std::FILE *stream_ = nullptr;
+};
+
+// A block from malloc: what is handed to a caller, who releases it with free.
+struct HeapFree {
+    void operator()(void *block) const noexcept
+    {
+        KeepErrno keep;
+        std::free(block);
+    }
+};
+
+template <class T>
+using HeapBlock = std::unique_ptr<T, HeapFree>;
+
+}  // namespace tavo
+
+#endif

@@ -1,0 +1,7 @@
+// Hands out the code of the last failure.
+#include "tavo_error.h"
+
+extern "C" int TLIBErrGet(void)
+{
+    return tavoerrno;
+}

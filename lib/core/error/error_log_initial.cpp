@@ -1,0 +1,18 @@
+// Empties a log file.
+#include "tavo_error.h"
+
+#include "core/detail/guard.h"
+#include "core/detail/log_file.h"
+
+extern "C" void TLIBErrLogInitial(const char *szPath)
+{
+    if (!szPath)
+        return;
+    try {
+        const tavo::Fd fd = tavo::OpenLogFile(szPath, O_WRONLY | O_CREAT | O_TRUNC);
+        if (fd)
+            tavo::SyncFd(fd.Get());
+    } catch (const std::bad_alloc &) {
+        return;  // silent, as for a file that cannot be opened
+    }
+}

@@ -1,0 +1,7 @@
+// Hands out the volume module's own error cell.
+#include "tavo_error.h"
+
+extern "C" int TAVOVolGetErr(void)
+{
+    return volerr;
+}

@@ -1,0 +1,155 @@
+// The error state: what sets it, what reads it, and the log file routines beside it.
+#include "tavo_error.h"
+
+#include "support/captured_log.h"
+#include "support/fault_state.h"
+#include "support/scratch_dir.h"
+
+#include <gtest/gtest.h>
+
+#include <cerrno>
+#include <string>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+using test::Fault;
+using test::LastFault;
+
+namespace {
+
+TEST(ErrorState, CodeAndSourceGoTogether)
+{
+    TLIBErrSetEx(ERR_BAD_PARAMETERS, "x", 7);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "x", 7}));
+    EXPECT_EQ(tavoerrno, 0x0D00);
+
+    TLIBErrSet(ERR_OPEN_FAILED);
+    EXPECT_EQ(TLIBErrGet(), 0x0900);
+    EXPECT_EQ(TAVOErrorGetFile(), nullptr);
+    EXPECT_EQ(TAVOErrorGetLine(), 0);
+
+    TAVOVolISetErr(0x1234);
+    EXPECT_EQ(TAVOVolGetErr(), 0x1234);
+    EXPECT_EQ(volerr, 0x1234);
+    EXPECT_EQ(TLIBErrGet(), 0x0900) << "the volume module's cell is another one";
+}
+
+TEST(ErrorTable, NamesStandAtTheirCodes)
+{
+    EXPECT_EQ(errNum, 145);
+    EXPECT_EQ(codeNum, 96);
+    int named = 0;
+    for (int i = 0; i < errNum; ++i) {
+        ASSERT_NE(rgszErrMsg[i], nullptr) << i;
+        named += rgszErrMsg[i][0] != 0;
+    }
+    EXPECT_EQ(named, 85);
+    const struct {
+        int code;
+        const char *name;
+    } rows[] = {
+        {0x0000, "ERR_SUCCESS"},
+        {0x0D00, "ERR_BAD_PARAMETERS"},
+        {0x2000, "ERR_KEY_NOT_FOUND"},
+        {0x2E00, "ERR_TIMER_EXPIRED"},
+        {0x2F00, ""},
+        {0x3000, "ERR_READ_GEO"},
+        {0x3900, ""},
+        {0x4000, "ERR_FORMAT_ERROR"},
+        {0x6D00, "ERR_BAD_DISKSECTOR"},
+        {0x7A00, "ERR_UDPD_RECV_FAIL"},
+        {0x8200, "ERR_VOLUME_SIZE_TOO_LARGE"},
+        {0x9000, "ERR_YP_BIND"},
+    };
+    for (const auto &row : rows)
+        EXPECT_STREQ(rgszErrMsg[row.code / 0x100], row.name) << std::hex << row.code;
+}
+
+TEST(ErrorPrint, LooksAtErrno)
+{
+    const struct {
+        int code;
+        const char *printed;
+    } rows[] = {
+        {0x9000, "ERR_YP_BIND\n"}, {0x3900, "\n"}, {0x9100, ""}, {0x0901, ""}, {-0x100, ""}, {ENOENT, ""},
+    };
+    for (const auto &row : rows) {
+        testing::internal::CaptureStdout();
+        errno = row.code;
+        TLIBErrPrint();
+        EXPECT_EQ(testing::internal::GetCapturedStdout(), row.printed) << row.code;
+    }
+}
+
+TEST(ErrorLogSet, AppendsOneLineAndKeepsTheRest)
+{
+    const test::ScratchDir dir;
+    const std::string log = dir / "log";
+    test::WriteFile(log, "earlier\n");
+    EXPECT_EQ(TLIBErrLogSet(log.c_str(), "100%% of %s, 5% left, %n%"), 0);
+    EXPECT_EQ(test::ReadFile(log), "earlier\n100% of %s, 5% left, %n%\n");
+
+    EXPECT_EQ(TLIBErrLogSet((dir / "new").c_str(), ""), 0);
+    EXPECT_EQ(test::ReadFile(dir / "new"), "\n");
+
+    TLIBErrLogInitial(log.c_str());
+    EXPECT_EQ(test::ReadFile(log), "");
+}
+
+TEST(ErrorLogSet, Refuses)
+{
+    const test::ScratchDir dir;
+    const std::string log = dir / "log";
+    const struct {
+        const char *path;
+        const char *message;
+        Fault fault;
+    } rows[] = {
+        {nullptr, "x", {ERR_BAD_PARAMETERS, "error_log_set", 33}},
+        {log.c_str(), nullptr, {ERR_BAD_PARAMETERS, "error_log_set", 33}},
+        {dir.Path().c_str(), "x", {ERR_OPEN_FAILED, "error_log_set", 38}},
+        {"/dev/full", "x", {ERR_WRITE_FAILED, "error_log_set", 52}},
+    };
+    for (const auto &row : rows) {
+        test::ForgetFault();
+        EXPECT_EQ(TLIBErrLogSet(row.path, row.message), -1);
+        EXPECT_EQ(LastFault(), row.fault);
+    }
+    EXPECT_TRUE(dir.Names().empty());
+
+    test::ForgetFault();
+    TLIBErrLogInitial(nullptr);
+    TLIBErrLogInitial(dir.Path().c_str());
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+}
+
+// In a directory that everybody may write to, somebody else's link or FIFO must not catch root; elsewhere a link is the
+// administrator's own.
+TEST(ErrorLog, TrapsInPublicDirectories)
+{
+    const test::ScratchDir dir;
+    const std::string target = dir / "target";
+    const std::string open_dir = dir / "open";
+    const std::string private_dir = dir / "private";
+    ASSERT_EQ(::mkdir(open_dir.c_str(), 0777), 0);
+    ASSERT_EQ(::chmod(open_dir.c_str(), 01777), 0);
+    ASSERT_EQ(::mkdir(private_dir.c_str(), 0755), 0);
+    test::WriteFile(target, "mine\n");
+    for (const std::string &where : {open_dir, private_dir})
+        ASSERT_EQ(::symlink(target.c_str(), (where + "/link").c_str()), 0);
+    ASSERT_EQ(::mkfifo((open_dir + "/fifo").c_str(), 0666), 0);
+
+    EXPECT_EQ(TLIBErrLogSet((open_dir + "/link").c_str(), "x"), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "error_log_set", 38}));
+    EXPECT_EQ(TLIBErrLogSet((open_dir + "/fifo").c_str(), "x"), -1);
+    TLIBErrLogInitial((open_dir + "/link").c_str());
+    TLIBErrLogInitial((open_dir + "/fifo").c_str());
+    EXPECT_EQ(test::ReadFile(target), "mine\n");
+
+    EXPECT_EQ(TLIBErrLogSet((private_dir + "/link").c_str(), "x"), 0);
+    EXPECT_EQ(test::ReadFile(target), "mine\nx\n");
+}
+
+}  // namespace

@@ -1,0 +1,37 @@
+// Takes the place of syslog in a test program: what the library logs is kept and can be compared.
+#ifndef TESTS_SUPPORT_CAPTURED_LOG_H
+#define TESTS_SUPPORT_CAPTURED_LOG_H
+
+#include <string>
+#include <vector>
+
+namespace test {
+
+struct LoggedLine {
+    int priority;
+    std::string text;
+
+    bool operator==(const LoggedLine &) const = default;
+};
+
+// From its construction on the lines are its own; one at a time.
+class CapturedLog {
+  public:
+    CapturedLog();
+    ~CapturedLog();
+    CapturedLog(const CapturedLog &) = delete;
+    CapturedLog &operator=(const CapturedLog &) = delete;
+
+    const std::vector<LoggedLine> &Lines() const { return lines_; }
+    std::vector<std::string> Texts() const;
+    void Clear() { lines_.clear(); }
+
+    void Add(int priority, std::string text) { lines_.push_back({priority, std::move(text)}); }
+
+  private:
+    std::vector<LoggedLine> lines_;
+};
+
+}  // namespace test
+
+#endif
