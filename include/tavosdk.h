@@ -1,0 +1,9 @@
+/*
+ * Every public header of libtavosdk.so.1.
+ */
+#ifndef TAVOSDK_H
+#define TAVOSDK_H
+
+#include "tavo_error.h"
+
+#endif
