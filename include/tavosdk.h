@@ -5,5 +5,6 @@
 #define TAVOSDK_H
 
 #include "tavo_error.h"
+#include "tavo_net.h"
 
 #endif

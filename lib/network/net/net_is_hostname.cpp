@@ -1,0 +1,25 @@
+// Tells whether a text can be the appliance's host name, which is its name in Windows networks too.
+#include "tavo_net.h"
+
+#include "core/detail/fault.h"
+#include "network/detail/name_text.h"
+
+namespace {
+
+constexpr size_t kLongest = 15;  // what NetBIOS leaves for a name
+
+}  // namespace
+
+extern "C" int BlTLIBIsHostname(const char *szName)
+{
+    if (!szName)
+        return FailZero(ERR_BAD_PARAMETERS);
+    const std::string_view name = szName;
+    if (name.empty() || name.size() > kLongest || !(tavo::IsLetter(name[0]) || name[0] == '_'))
+        return FailZero(ERR_INVALID_NETNAME);
+    for (const char byte : name) {
+        if (!tavo::IsLetter(byte) && !tavo::IsDigit(byte) && byte != '-' && byte != '_')
+            return FailZero(ERR_INVALID_NETNAME);
+    }
+    return 1;
+}

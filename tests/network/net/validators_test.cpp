@@ -1,0 +1,179 @@
+// Validators and conversions: tables of what is accepted and refused, and a comparison with the C library's own view.
+#include "tavo_net.h"
+
+#include "support/fault_state.h"
+
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <random>
+#include <string>
+#include <vector>
+
+#include <arpa/inet.h>
+
+namespace {
+
+using Validator = int (*)(const char *);
+
+int IsIpMask(const char *text)
+{
+    char copy[64] = "";
+    return BlTLIBIsIpMask(text ? std::strncpy(copy, text, sizeof copy - 1) : nullptr);
+}
+
+struct Table {
+    const char *name;
+    Validator valid;
+    std::vector<std::string> accepted;
+    std::vector<std::string> refused;
+};
+
+std::vector<Table> Tables()
+{
+    const std::string x63(63, 'x');
+    const std::string d255 = x63 + "." + x63 + "." + x63 + "." + x63;
+    return {
+        {"IsIpAddr",
+         BlTLIBIsIpAddr,
+         {"1.0.0.0", "10.0.255.1", "223.255.255.254", "192.168.001.010"},
+         {"", "127.0.0.1", "0.1.2.3", "224.0.0.1", "10.0.0.255", "10.256.0.1", "10.0.0", "10.0.0.0.1", "10.0.0.1;x",
+          " 10.0.0.1", "10.0.0.1 ", "+10.0.0.1", "10.0.0.-1", "10..0.1", "10.0.0.1\n", "0010.0.0.1", "4294967306.0.0.1",
+          "a.b.c.d", "10,0,0,1"}},
+        {"IsIpMask",
+         IsIpMask,
+         {"255.255.255.0", "255.255.254.0", "255.255.255.255", "128.0.0.0", "0.0.0.0", "255.255.000.0"},
+         {"", "255.0.255.0", "255.255.255.1", "0.255.255.255", "255.255.255", "256.0.0.0", "255.255.255.0x"}},
+        {"IsHostname",
+         BlTLIBIsHostname,
+         {"n", "_nas", "NAS-1_b", "abcdefghijklmno"},
+         {"", "1nas", "-nas", "abcdefghijklmnop", "na.s", "na s", "n\xC3\xA4s", "nas;reboot"}},
+        {"IsDomain",
+         BlTLIBIsDomain,
+         {"a", "example.com", "a-b.c--d.e", "1.2", x63 + ".x", d255},
+         {"", ".", "a.", ".a", "a..b", "-a.b", "a-.b", "a_b", "a b", x63 + "x", d255 + "x", "b\xC3\xBC.de"}},
+        {"IsAtom",
+         BlTLIBIsAtom,
+         {"a", "!#$%&'*+-/=?^_`{|}~", "09"},
+         {"", "a.b", "a b", "a@b", "(", ")", "<", ">", "[", "]", ",", ";", ":", "\\", "\"", "\x7F", "\xC3\xA4", "\t"}},
+        {"IsMailbox",
+         BlTLIBIsMailbox,
+         {"a@b", "first.last@example.com", "a+b=c@x-y.z"},
+         {"", "@", "a@", "@b", "a@@b", ".a@b", "a.@b", "a..b@c", "a@b@c", "a b@c", "a@b.", "a\n@b", "\"a\"@b"}},
+        {"IsWorkGroupName",
+         BlTLIBIsWorkGroupName,
+         {"WORKGROUP", "a", "my group", "!@#$%^&()-_'{}", "x.y~"},
+         {"", "0123456789012345", ".x", " x", "x ", "a/b", "a\\b", "a:b", "a*", "a?", "\"", "<a>", "a|b", "a\n",
+          "\xC3\xA4"}},
+        {"IsSubNet",
+         BlTLIBIsSubNet,
+         {"10.0.0.0/255.0.0.0", "192.168.1.7/255.255.255.128"},
+         {"", "10.0.0.0", "10.0.0.0/", "/255.0.0.0", "10.0.0.0/8", "10.0.0.0/255.0.255.0", "10.0.0.0/255.0.0.0/1"}},
+        {"Isv6IpAddrValid",
+         BlTLIBIsv6IpAddrValid,
+         {"::", "::1", "fe80::1", "2001:db8::192.0.2.1", "1:2:3:4:5:6:7:8"},
+         {"", ":", "1:2:3:4:5:6:7", "fe80::1%eth0", "::1/64", "::g", "1::2::3", "10.0.0.1", " ::1"}},
+    };
+}
+
+TEST(Validators, AcceptAndRefuse)
+{
+    for (const Table &table : Tables()) {
+        for (const std::string &text : table.accepted) {
+            test::ForgetFault();
+            EXPECT_EQ(table.valid(text.c_str()), 1) << table.name << " \"" << text << '"';
+            EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS) << table.name;
+        }
+        for (const std::string &text : table.refused) {
+            test::ForgetFault();
+            EXPECT_EQ(table.valid(text.c_str()), 0) << table.name << " \"" << text << '"';
+            EXPECT_EQ(TLIBErrGet(), ERR_INVALID_NETNAME) << table.name << " \"" << text << '"';
+        }
+        test::ForgetFault();
+        EXPECT_EQ(table.valid(nullptr), 0) << table.name;
+        EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS) << table.name;
+    }
+}
+
+TEST(IsIpMask, WritesTheCanonicalForm)
+{
+    char mask[] = "255.255.000.00";
+    EXPECT_EQ(BlTLIBIsIpMask(mask), 1);
+    EXPECT_STREQ(mask, "255.255.0.0");
+    char broken[] = "255.000.255.0";
+    EXPECT_EQ(BlTLIBIsIpMask(broken), 0);
+    EXPECT_STREQ(broken, "255.000.255.0") << "a refused text stays as it is";
+}
+
+struct Conversion {
+    int (*convert)(char *, char *);
+    const char *in;
+    const char *out;  // NULL: refused with `code`
+    int code;
+};
+
+TEST(Conversions, SubnetsAndMasks)
+{
+    const Conversion rows[] = {
+        {ErrTLIBIpMaskToSubnet, "192.168.1.7/255.255.255.0", "192.168.1.0/24", 0},
+        {ErrTLIBIpMaskToSubnet, "10.1.2.3/255.255.255.255", "10.1.2.3/32", 0},
+        {ErrTLIBIpMaskToSubnet, "192.168.1.255/255.255.255.0", nullptr, ERR_INVALID_NETNAME},
+        {ErrTLIBIpMaskToSubnet, "10.0.255.1/255.0.0.0", nullptr, ERR_INVALID_NETNAME},
+        {ErrTLIBIpMaskToSubnet, "10.0.0.1/255.0.255.0", nullptr, ERR_INVALID_NETNAME},
+        {ErrTLIBIpMaskToSubnet, "10.0.0.1", nullptr, ERR_BAD_PARAMETERS},
+        {ErrTLIBIpMaskToSubnet, "10.0.0.1/", nullptr, ERR_INVALID_NETNAME},
+        {ErrTLIBSubnetToIpMask, "10.1.2.3/8", "10.0.0.0/255.0.0.0", 0},
+        {ErrTLIBSubnetToIpMask, "10.1.2.3/010", "10.0.0.0/255.0.0.0", 0},
+        {ErrTLIBSubnetToIpMask, "10.1.2.3/0x18", "10.1.2.0/255.255.255.0", 0},
+        {ErrTLIBSubnetToIpMask, "10.1.2.3/32", "10.1.2.3/255.255.255.255", 0},
+        {ErrTLIBSubnetToIpMask, "10.1.2.3/0", nullptr, ERR_INVALID_NETNAME},
+        {ErrTLIBSubnetToIpMask, "10.1.2.3/33", nullptr, ERR_INVALID_NETNAME},
+        {ErrTLIBSubnetToIpMask, "10.1.2.3/8x", nullptr, ERR_INVALID_NETNAME},
+        {ErrTLIBSubnetToIpMask, "10.1.2.3/", nullptr, ERR_INVALID_NETNAME},
+        {ErrTLIBSubnetToIpMask, "10.1.2.3/99999999999999999999", nullptr, ERR_INVALID_NETNAME},
+        {ErrTLIBSubnetToIpMask, "10.1.2/8", nullptr, ERR_INVALID_NETNAME},
+        {ErrTLIBSubnetToIpMask, "10.1.2.3", nullptr, ERR_BAD_PARAMETERS},
+    };
+    for (const Conversion &row : rows) {
+        char in[64] = "";
+        std::strcpy(in, row.in);
+        char out[64] = "untouched";
+        test::ForgetFault();
+        EXPECT_EQ(row.convert(in, out), row.out ? 0 : -1) << row.in;
+        EXPECT_STREQ(out, row.out ? row.out : "untouched") << row.in;
+        EXPECT_STREQ(in, row.in);
+        EXPECT_EQ(TLIBErrGet(), row.code) << row.in;
+        EXPECT_EQ(row.convert(in, nullptr), row.out ? 0 : -1);
+        EXPECT_STREQ(in, row.out ? row.out : row.in) << "over the input";
+    }
+    EXPECT_EQ(ErrTLIBIpMaskToSubnet(nullptr, nullptr), -1);
+    EXPECT_EQ(ErrTLIBSubnetToIpMask(nullptr, nullptr), -1);
+}
+
+// Every address that is accepted here and has no leading zeros is one for the C library too, and the other way round
+// but for the ranges that no host can have.
+TEST(IsIpAddr, AgreesWithTheCLibrary)
+{
+    std::mt19937 random(1);
+    const std::string alphabet = "0123456789..../ x";
+    for (int round = 0; round < 300000; ++round) {
+        std::string text;
+        if (round % 2) {
+            for (int i = 0; i < 4; ++i)
+                text += (i ? "." : "") + std::to_string(random() % 300);
+        } else {
+            for (auto length = random() % 12; length > 0; --length)
+                text += alphabet[random() % alphabet.size()];
+        }
+        in_addr address{};
+        const bool known = ::inet_pton(AF_INET, text.c_str(), &address) == 1;
+        const uint32_t word = ntohl(address.s_addr);
+        const bool host = known && word >> 24 != 0 && word >> 24 != 127 && word >> 24 <= 223 && (word & 0xFF) != 255;
+        const bool leading_zero = text[0] == '0' || text.find(".0") != std::string::npos;
+        if (!leading_zero) {
+            ASSERT_EQ(BlTLIBIsIpAddr(text.c_str()) == 1, host) << text;
+        }
+    }
+}
+
+}  // namespace
