@@ -1,0 +1,97 @@
+// What the kernel's files say of the network, and what becomes of /etc/hosts.
+#include "network/detail/bonding.h"
+#include "network/detail/hosts_file.h"
+#include "network/detail/interface_name.h"
+#include "network/detail/route_table.h"
+#include "network/detail/socket_table.h"
+
+#include <gtest/gtest.h>
+
+namespace {
+
+constexpr const char *kRoutes = "Iface\tDestination\tGateway \tFlags\tRefCnt\tUse\tMetric\tMask\t\tMTU\tWindow\tIRTT\n"
+                                "eth0\t00000000\t0101A8C0\t0003\t0\t0\t0\t00000000\t0\t0\t0\n"
+                                "short row\n"
+                                "eth1\t000AA8C0\t00000000\t0001\t0\t0\t100\t00FFFFFF\t0\t0\t0\n"
+                                "eth2\tzz000000\t00000000\t0001\t0\t0\t0\t00000000\t0\t0\t0\n"
+                                "eth3\t00000000\t0201A8C0\t0002\t0\t0\t0\t00000000\t0\t0\t0\n";
+
+TEST(RouteTable, ReadsTheKernelsRows)
+{
+    const auto routes = tavo::ParseRouteTable(kRoutes);
+    ASSERT_TRUE(routes);
+    ASSERT_EQ(routes->size(), 3u);
+    EXPECT_TRUE((*routes)[0].IsDefault());
+    EXPECT_EQ((*routes)[0].interface, "eth0");
+    EXPECT_EQ((*routes)[0].gateway.Text(), "192.168.1.1");
+    EXPECT_FALSE((*routes)[1].IsDefault());
+    EXPECT_EQ((*routes)[1].destination.Text(), "192.168.10.0");
+    EXPECT_EQ((*routes)[1].mask.Text(), "255.255.255.0");
+    EXPECT_FALSE((*routes)[2].IsDefault()) << "a route that is down leads nowhere";
+
+    EXPECT_FALSE(tavo::ParseRouteTable(""));
+    EXPECT_FALSE(tavo::ParseRouteTable("Iface\tDestination\tGateway\n"));
+}
+
+TEST(SocketTable, FindsTheLocalPort)
+{
+    const struct {
+        const char *row;
+        int port;  // -1: none
+    } rows[] = {
+        {"   0: 0100007F:1F90 00000000:0000 0A 00000000:00000000 00:00000000 00000000     0        0 1 1", 0x1F90},
+        {"  12: 00000000000000000000000001000000:0016 0000:0000 0A", 22},
+        {"1234: 00000000:270F", 9999},
+        {"  sl  local_address rem_address   st tx_queue", -1},
+        {"   0: :1F90 00000000:0000", -1},
+        {"   0: 0100007F:11F90 00000000:0000", -1},
+        {"   0: 0100007F:1F9x", -1},
+        {"   0: 0100007F", -1},
+        {"", -1},
+        {"    ", -1},
+    };
+    for (const auto &row : rows)
+        EXPECT_EQ(tavo::LocalPort(row.row).value_or(-1), row.port) << row.row;
+}
+
+TEST(Bonding, ModesAndOptions)
+{
+    using tavo::BondMode;
+    EXPECT_EQ(tavo::ParseBondMode("active-backup 1\n"), BondMode::backup);
+    EXPECT_EQ(tavo::ParseBondMode("802.3ad 4\n"), BondMode::lacp);
+    EXPECT_EQ(tavo::ParseBondMode("balance-alb 6"), BondMode::adaptive);
+    EXPECT_EQ(tavo::ParseBondMode("balance-rr 0\n"), std::nullopt);
+    EXPECT_EQ(tavo::ParseBondMode(""), std::nullopt);
+    EXPECT_EQ(tavo::BondOptions(BondMode::lacp), "\"mode=4 use_carrier=0 miimon=100 updelay=100 lacp_rate=fast\"");
+    EXPECT_EQ(tavo::BondOptions(BondMode::none), "");
+}
+
+TEST(Bonding, Partner)
+{
+    const std::string before = "802.3ad info\nActive Aggregator Info:\n\tAggregator ID: 1\n";
+    EXPECT_EQ(tavo::ParsePartnerMac(before + "\tPartner Mac Address: 52:54:00:aa:bb:cc\n"), "52:54:00:aa:bb:cc");
+    EXPECT_EQ(tavo::ParsePartnerMac(before + "\tPartner Mac Address: 00:00:00:00:00:00\n"), "");
+    EXPECT_EQ(tavo::ParsePartnerMac(before), "");
+}
+
+TEST(HostsFile, KeepsTheAdministratorsLines)
+{
+    EXPECT_EQ(tavo::HostsWithName("", "", "nas", "10.0.0.5"), "127.0.0.1\tlocalhost\n10.0.0.5\tnas\n");
+    EXPECT_EQ(
+        tavo::HostsWithName("127.0.0.1  localhost\n10.0.0.4\told\n# printers\n10.0.0.9 lp lp.local\n::1 localhost6",
+                            "old", "nas", "10.0.0.5"),
+        "127.0.0.1\tlocalhost\n10.0.0.5\tnas\n# printers\n10.0.0.9 lp lp.local\n::1 localhost6\n");
+    EXPECT_EQ(tavo::HostsWithName("10.0.0.4\tnas\n10.0.0.4\tnas alias\n", "", "nas", ""),
+              "127.0.0.1\tlocalhost\n10.0.0.4\tnas alias\n");
+}
+
+TEST(InterfaceName, TakesOnlyWhatCanBeOne)
+{
+    for (const char *name : {"eth0", "bond0", "ppp0", "eth0:1", "eth0.100", "br-lan", "wlan_1", "abcdefghijklmno"})
+        EXPECT_TRUE(tavo::IsInterfaceName(name)) << name;
+    for (const char *name : {"", ".", "..", "-eth0", "../../shadow", "eth0;reboot", "eth 0", "eth0\n", "$(x)", "`x`",
+                             "a/b", "abcdefghijklmnop", "eth\xC3\xA4"})
+        EXPECT_FALSE(tavo::IsInterfaceName(name)) << name;
+}
+
+}  // namespace
