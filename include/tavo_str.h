@@ -1,0 +1,62 @@
+/*
+ * String helpers: tokens, trimming, colon encoding, and UTF-8 without regard to case.
+ *
+ * All work on memory that the caller owns; nothing is allocated for the caller. A code is recorded only with the
+ * failures that name one.
+ */
+#ifndef TAVO_STR_H
+#define TAVO_STR_H
+
+#include "tavo_error.h"
+
+TAVO_BEGIN_DECLS
+
+/* Cuts the next token off the text at *ppCursor: writes a NUL over the next byte of szDelimiters and moves *ppCursor
+ * behind it, or to NULL at the end of the text. Empty tokens are skipped.
+ * Returns the token; NULL when the text is used up or an argument is NULL. */
+TAVO_API char *TLIBStrTok(char **ppCursor, const char *szDelimiters);
+TAVO_API char *TLIBIStrTok(char **ppCursor, const char *szDelimiters);
+
+/* The same, but an empty token is returned too: "a::b" at ":" gives "a", "" and "b". */
+TAVO_API char *TLIBStrSep(char **ppCursor, const char *szDelimiters);
+
+/* Copies szSrc to szDst without the white space at both ends (tab, line feed, carriage return, space), and then without
+ * one pair of enclosing double quotes. szDst NULL or szSrc itself: in place; else it has room for the result.
+ * Returns the length of the result without its NUL. -1 with
+ *   ERR_BAD_PARAMETERS  szSrc is NULL, or szDst overlaps it elsewhere than at its beginning; nothing was written */
+TAVO_API int TLIBStrTrimSpace(char *szSrc, char *szDst);
+
+/*
+ * Colon encoding: any text becomes one that fits in a field of a line of colon-separated fields, and back. A colon is
+ * written as "%3A", a line feed as "%0A", a carriage return as "%0D"; a percent sign as "%25" where the text itself
+ * goes on with "25", "3A", "0A" or "0D", and as itself elsewhere. Every other byte stands for itself, so text without a
+ * colon mostly looks as it was typed. Decoding what was encoded gives the same bytes, for every string; text that was
+ * never encoded decodes too, and only these four sequences change.
+ *
+ * Both return the length of the result with its NUL, or -1 with
+ *   ERR_BAD_PARAMETERS     szSrc is NULL, cbDst is negative, szDst is NULL while cbDst is not 0, or they overlap
+ *   ERR_NOT_ENOUGH_MEMORY  szDst is too small; nothing was written
+ * szDst NULL with cbDst 0 asks for that length. Decoding may be done in place (szDst is szSrc).
+ */
+TAVO_API int TLIBStrEncodeColon(const char *szSrc, char *szDst, int cbDst);
+TAVO_API int TLIBStrDecodeColon(const char *szSrc, char *szDst, int cbDst);
+
+/* Copies the UTF-8 text szSrc in upper case, by the rules of no particular language, to szDst of cbDst bytes. The
+ * result can be longer than the source. szDst may be szSrc. Returns the length of the result with its NUL; szDst NULL
+ * with cbDst 0 asks for it. -1, and nothing written, with ERR_BAD_PARAMETERS     szSrc is NULL or is not UTF-8, cbDst
+ * is negative, or szDst is NULL while cbDst is not 0 ERR_NOT_ENOUGH_MEMORY  szDst is too small ERR_OUT_OF_MEMORY no
+ * memory for a long text */
+TAVO_API int TLIBUnicodeUTF8StrUpper(const char *szSrc, char *szDst, int cbDst);
+
+/* The number of characters (code points) of the UTF-8 text sz. -1 with ERR_BAD_PARAMETERS: sz is NULL or is not UTF-8.
+ */
+TAVO_API int TLIBUnicodeUTF8StrCountChar(const char *sz);
+
+/* Compares two UTF-8 texts without regard to case, by the rules of no particular language ("ß" equals "SS").
+ * Returns -1, 0 or 1 as szLeft is less than, equal to or greater than szRight. -2 with ERR_BAD_PARAMETERS: an argument
+ * is NULL, or one of them is not UTF-8, wherever in the text. */
+TAVO_API int TLIBUnicodeUTF8StrCaseCmp(const char *szLeft, const char *szRight);
+
+TAVO_END_DECLS
+
+#endif
