@@ -2,4 +2,8 @@
 
 find_package(PkgConfig REQUIRED)
 pkg_check_modules(ICU REQUIRED IMPORTED_TARGET icu-uc)
-set(TAVO_LIBRARY_DEPENDENCIES PkgConfig::ICU)
+
+# The account stores. Debian's package has neither a pkg-config file nor a CMake one.
+find_path(BERKELEY_DB_INCLUDE_DIR db_185.h REQUIRED)
+
+set(TAVO_LIBRARY_DEPENDENCIES PkgConfig::ICU db-5.3)

@@ -4,6 +4,7 @@
 #ifndef TAVOSDK_H
 #define TAVOSDK_H
 
+#include "tavo_bdb.h"
 #include "tavo_error.h"
 #include "tavo_net.h"
 

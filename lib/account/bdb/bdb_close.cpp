@@ -1,0 +1,19 @@
+// Closes a store.
+#include "tavo_bdb.h"
+
+#include "account/detail/btree.h"
+#include "core/detail/log.h"
+
+#include <cerrno>
+
+extern "C" int TAVOBDbClose(TAVOBDB *pDb)
+{
+    if (!pDb)
+        return Fail(ERR_BAD_PARAMETERS);
+    const std::unique_ptr<tavo::Btree> store(tavo::Btree::Of(pDb));
+    if (const int code = store->Close()) {
+        LogError("%s:%d Failed to close a store, errno=%d", errno);
+        return Fail(code);
+    }
+    return 0;
+}

@@ -1,0 +1,9 @@
+// Releases a value that a read handed out.
+#include "tavo_bdb.h"
+
+#include <cstdlib>
+
+extern "C" void TAVOBDbFree(void *pValue)
+{
+    std::free(pValue);
+}

@@ -1,0 +1,26 @@
+// Reads the value of a key.
+#include "tavo_bdb.h"
+
+#include "account/detail/btree.h"
+#include "account/detail/store_bytes.h"
+#include "core/detail/log.h"
+
+#include <cerrno>
+
+extern "C" int TAVOBDbGet(TAVOBDB *pDb, const void *pKey, int cbKey, void **ppValue, int *pcbValue)
+{
+    if (!pDb || !pKey || cbKey <= 0 || !ppValue || !pcbValue)
+        return Fail(ERR_BAD_PARAMETERS);
+    std::string_view value;
+    if (const int code = tavo::Btree::Of(pDb)->Get(tavo::BytesOf(pKey, cbKey), value)) {
+        if (code != ERR_KEY_NOT_FOUND)
+            LogError("%s:%d Failed to read a key, errno=%d", errno);
+        return Fail(code);
+    }
+    tavo::HeapBlock<void> copy = tavo::CopyBytes(value);
+    if (!copy)
+        return Fail(ERR_OUT_OF_MEMORY);
+    *ppValue = copy.release();
+    *pcbValue = static_cast<int>(value.size());
+    return 0;
+}

@@ -1,0 +1,247 @@
+// Reads, changes and walks one open store.
+#include "account/detail/btree.h"
+
+#include "account/detail/btree_file.h"
+#include "account/detail/store_seal.h"
+#include "account/detail/store_sync.h"
+#include "core/detail/owner.h"
+
+#include <cstring>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+
+#include <db_185.h>
+
+namespace tavo {
+namespace {
+
+DB *Handle(const TAVOBDB *store)
+{
+    return static_cast<DB *>(store->pDb);
+}
+
+DBT Item(std::string_view bytes)
+{
+    return {const_cast<char *>(bytes.data()), bytes.size()};
+}
+
+std::string_view Bytes(const DBT &item)
+{
+    return {static_cast<const char *>(item.data), item.size};
+}
+
+// The code of a failed call, by errno; `other` where the system's reason has no code of its own.
+int CodeOf(int reason, int other)
+{
+    switch (reason) {
+    case EIO:
+        return ERR_DISK_IO_FAILED;
+    case EINTR:
+        return ERR_DB_INTERRUPTED;
+    case ENOSPC:
+    case EDQUOT:
+        return other == ERR_DB_CURSOR ? other : ERR_NOT_ENOUGH_SPACE;
+    case ENOMEM:
+        return ERR_OUT_OF_MEMORY;
+    default:
+        return other;
+    }
+}
+
+int OpenCode(int reason)
+{
+    switch (reason) {
+    case ENOMEM:
+        return ERR_OUT_OF_MEMORY;
+    case EACCES:
+    case EPERM:
+        return ERR_ACCESS_DENIED;
+    case ENOENT:
+        return ERR_FILE_NOT_FOUND;
+    case EINVAL:
+        return ERR_DB_OPEN;
+    case ENOSPC:
+    case EDQUOT:
+        return ERR_NOT_ENOUGH_SPACE;
+    default:
+        return ERR_OPEN_FAILED;
+    }
+}
+
+unsigned SequenceFlag(int32_t cursor_type)
+{
+    switch (cursor_type) {
+    case TAVO_BDB_CURSOR_KEY:
+        return R_CURSOR;
+    case TAVO_BDB_CURSOR_FIRST:
+        return R_FIRST;
+    case TAVO_BDB_CURSOR_LAST:
+        return R_LAST;
+    case TAVO_BDB_CURSOR_PREV:
+        return R_PREV;
+    default:
+        return R_NEXT;
+    }
+}
+
+// A file that is no store goes, so that the next open can make a new one.
+int RemoveForeign(const char *path)
+{
+    ::unlink(path);
+    errno = EINVAL;
+    return ERR_DB_OPEN;
+}
+
+}  // namespace
+
+int Btree::Open(const char *path, const Options &options, std::unique_ptr<Btree> &out)
+{
+    const bool may_create = (options.flags & O_CREAT) != 0;
+    struct stat st;
+    if (may_create && ::lstat(path, &st) == 0 && S_ISREG(st.st_mode) &&
+        (st.st_size == 0 || (options.flags & O_TRUNC) != 0))
+        ::unlink(path);  // an empty file is as good as none to a caller who would create one
+    switch (LookAtBtreeFile(path, options.mode)) {
+    case BtreeFile::foreign:
+        return RemoveForeign(path);
+    case BtreeFile::unreadable:
+        return OpenCode(errno);
+    case BtreeFile::missing:
+        if (!may_create)
+            return ERR_FILE_NOT_FOUND;
+        if (!CreateBtreeFile(path, options.info, options.mode))
+            return OpenCode(errno);
+        break;
+    case BtreeFile::store:
+        break;
+    }
+    std::unique_ptr<Btree> store(new Btree(path, (options.flags & O_ACCMODE) == O_RDONLY));
+    BTREEINFO parameters = {};
+    errno = 0;
+    store->pDb = ::dbopen(path, options.flags & O_ACCMODE, 0, DB_BTREE, options.info ? &parameters : nullptr);
+    if (!store->pDb)
+        return errno == EINVAL ? RemoveForeign(path) : OpenCode(errno);
+    out = std::move(store);
+    return 0;
+}
+
+Btree::~Btree()
+{
+    KeepErrno keep;
+    Close();
+}
+
+int Btree::Get(std::string_view key, std::string_view &value) const
+{
+    const DBT wanted = Item(key);
+    DBT found = {};
+    const int result = Handle(this)->get(Handle(this), &wanted, &found, 0);
+    if (result != 0)
+        return result > 0 ? ERR_KEY_NOT_FOUND : CodeOf(errno, ERR_DB_CURSOR);
+    value = Bytes(found);
+    return 0;
+}
+
+int Btree::Set(std::string_view key, std::string_view value)
+{
+    if (!NoteChange())
+        return ERR_DB_STORE;
+    DBT name = Item(key);
+    const DBT content = Item(value);
+    // Files of the first appliances had duplicate reserved keys; storing over one of them kept the other.
+    if (key.starts_with('#') && Handle(this)->del(Handle(this), &name, 0) < 0)
+        return CodeOf(errno, ERR_DB_STORE);
+    if (Handle(this)->put(Handle(this), &name, &content, 0) != 0)
+        return CodeOf(errno, ERR_DB_STORE);
+    if (const auto gone = deleted_.find(key); gone != deleted_.end())
+        deleted_.erase(gone);
+    return 0;
+}
+
+int Btree::Delete(std::string_view key)
+{
+    if (!NoteChange())
+        return ERR_DB_DELETE;
+    const DBT name = Item(key);
+    const int result = Handle(this)->del(Handle(this), &name, 0);
+    if (result != 0)
+        return result > 0 ? ERR_KEY_NOT_FOUND : CodeOf(errno, ERR_DB_DELETE);
+    deleted_.emplace(key);
+    return 0;
+}
+
+int Btree::Step(bool skip_reserved, std::string_view &key, std::string_view &value)
+{
+    for (;;) {
+        const unsigned flag = SequenceFlag(nCursorType);
+        DBT name = Item(key);
+        DBT found = {};
+        const int result = Handle(this)->seq(Handle(this), &name, &found, flag);
+        if (result != 0)
+            return result > 0 ? ERR_DB_END : CodeOf(errno, ERR_DB_CURSOR);
+        if (!skip_reserved || flag == R_CURSOR || !Bytes(name).starts_with('#')) {
+            key = Bytes(name);
+            value = Bytes(found);
+            return 0;
+        }
+        if (flag == R_FIRST)
+            nCursorType = TAVO_BDB_CURSOR_NEXT;
+        else if (flag == R_LAST)
+            nCursorType = TAVO_BDB_CURSOR_PREV;
+    }
+}
+
+int Btree::GetNumber(std::string_view key, int32_t &value) const
+{
+    std::string_view bytes;
+    if (const int code = Get(key, bytes))
+        return code;
+    if (bytes.size() != sizeof value)
+        return ERR_DB_CURSOR;
+    std::memcpy(&value, bytes.data(), sizeof value);
+    return 0;
+}
+
+int Btree::SetNumber(std::string_view key, int32_t value)
+{
+    return Set(key, {reinterpret_cast<const char *>(&value), sizeof value});
+}
+
+int Btree::Flush()
+{
+    const NoStoreSync no_sync;
+    return Handle(this)->sync(Handle(this), 0) == 0 ? 0 : CodeOf(errno, ERR_DB_STORE);
+}
+
+int Btree::Close()
+{
+    if (!pDb)
+        return 0;
+    const NoStoreSync no_sync;
+    DB *db = static_cast<DB *>(std::exchange(pDb, nullptr));
+    if (db->close(db) != 0)
+        return ERR_DB_CLOSE;
+    if (sealed_)
+        WriteSeal(*FamilyOfStore(path_.c_str()));
+    return 0;
+}
+
+// A change through a handle of a caller's own, not by the account families (they break the seal first and make it anew
+// themselves), keeps the stores sealed.
+bool Btree::NoteChange()
+{
+    if (read_only_) {
+        errno = EPERM;  // the database would print that to standard error
+        return false;
+    }
+    if (std::exchange(changed_, true))
+        return true;
+    const StoreFamily *family = FamilyOfStore(path_.c_str());
+    sealed_ = family && SealHolds(*family);
+    if (sealed_)
+        BreakSeal(*family);
+    return true;
+}
+
+}  // namespace tavo

@@ -1,0 +1,83 @@
+// One open store: a btree file of Berkeley DB behind a handle that callers know as TAVOBDB. What goes wrong comes back
+// as an error code; nothing here sets the error state or logs, and errno says what the system said.
+#ifndef TAVO_ACCOUNT_DETAIL_BTREE_H
+#define TAVO_ACCOUNT_DETAIL_BTREE_H
+
+#include "tavo_bdb.h"
+
+#include <memory>
+#include <set>
+#include <string>
+#include <string_view>
+
+#include <sys/types.h>
+
+namespace tavo {
+
+class Btree : public TAVOBDB {
+  public:
+    // `mode` is given to a file that is created, and to any file when we are root; 0 leaves an existing file's alone.
+    struct Options {
+        int flags = 0;
+        bool info = true;
+        mode_t mode = 0;
+    };
+
+    // 0 and a handle, or an error code. A file that is no store has been deleted with ERR_DB_OPEN.
+    static int Open(const char *path, const Options &options, std::unique_ptr<Btree> &out);
+
+    // The handle behind a caller's pointer: every TAVOBDB comes from Open.
+    static Btree *Of(TAVOBDB *handle) { return static_cast<Btree *>(handle); }
+    static const Btree *Of(const TAVOBDB *handle) { return static_cast<const Btree *>(handle); }
+
+    ~Btree();
+    Btree(const Btree &) = delete;
+    Btree &operator=(const Btree &) = delete;
+
+    // The views stay valid until the next call on this handle. Absent: ERR_KEY_NOT_FOUND.
+    int Get(std::string_view key, std::string_view &value) const;
+    int Set(std::string_view key, std::string_view value);
+    int Delete(std::string_view key);
+
+    // One step as nCursorType says; past the end: ERR_DB_END. `key` is read for TAVO_BDB_CURSOR_KEY.
+    int Step(bool skip_reserved, std::string_view &key, std::string_view &value);
+
+    // A 32-bit value of a reserved key. ERR_DB_CURSOR when it is there but not four bytes long.
+    int GetNumber(std::string_view key, int32_t &value) const;
+    int SetNumber(std::string_view key, int32_t value);
+
+    int Flush();  // hands all pages to the file
+    int Close();  // Flush and release; ERR_DB_CLOSE
+
+    // The keys that were deleted through this handle and not stored again.
+    const std::set<std::string, std::less<>> &Deleted() const { return deleted_; }
+
+  private:
+    Btree(const char *path, bool read_only) : TAVOBDB{nullptr, TAVO_BDB_CURSOR_NEXT}, path_(path), read_only_(read_only)
+    {
+    }
+    bool NoteChange();  // false when nothing may be changed
+
+    std::string path_;
+    std::set<std::string, std::less<>> deleted_;
+    bool read_only_;
+    bool changed_ = false;
+    bool sealed_ = false;  // before our first change, the seal beside the store held for this file
+};
+
+// The stored bytes of the reserved keys.
+inline constexpr std::string_view kSyncTimeKey{TAVO_BDB_KEY_SYNC_TIME, TAVO_BDB_KEY_SYNC_TIME_LEN};
+inline constexpr std::string_view kDeprecatedKey{TAVO_BDB_KEY_DEPRECATED, TAVO_BDB_KEY_DEPRECATED_LEN};
+inline constexpr std::string_view kExpireKey{TAVO_BDB_KEY_EXPIRE, TAVO_BDB_KEY_EXPIRE_LEN};
+inline constexpr std::string_view kCurrentUidKey{TAVO_BDB_KEY_UID, TAVO_BDB_KEY_UID_LEN};
+inline constexpr std::string_view kCurrentGidKey{TAVO_BDB_KEY_GID, TAVO_BDB_KEY_GID_LEN};
+
+static_assert(sizeof(TAVO_BDB_KEY_SYNC_TIME) == TAVO_BDB_KEY_SYNC_TIME_LEN + 1);
+static_assert(sizeof(TAVO_BDB_KEY_DEPRECATED) == TAVO_BDB_KEY_DEPRECATED_LEN);
+static_assert(sizeof(TAVO_BDB_KEY_EXPIRE) == TAVO_BDB_KEY_EXPIRE_LEN + 1);
+static_assert(sizeof(TAVO_BDB_KEY_UID) == TAVO_BDB_KEY_UID_LEN + 1);
+static_assert(sizeof(TAVO_BDB_KEY_GID) == TAVO_BDB_KEY_GID_LEN + 1);
+
+}  // namespace tavo
+
+#endif

@@ -1,0 +1,105 @@
+// Makes, checks and breaks the seal on the stores of a family.
+#include "account/detail/store_seal.h"
+
+#include "core/detail/open_file.h"
+
+#include <cinttypes>
+#include <cstring>
+#include <string>
+
+namespace tavo {
+namespace {
+
+constexpr size_t kLargestSeal = 8192;
+
+std::string ReadSmall(const Fd &fd)
+{
+    std::string text(kLargestSeal, '\0');
+    const ssize_t length = fd ? ::read(fd.Get(), text.data(), text.size()) : 0;
+    text.resize(length > 0 ? static_cast<size_t>(length) : 0);
+    return text;
+}
+
+// Stores are not synced to disk, so those that a crash of the machine left behind are not to be trusted.
+std::string RunOfTheMachine()
+{
+    return ReadSmall(OpenFd("/proc/sys/kernel/random/boot_id", O_RDONLY));
+}
+
+// One line that changes with every change of the file. False for what is no plain file.
+bool AddLine(std::string &text, const char *path, bool may_be_missing)
+{
+    struct stat st;
+    char line[256];
+    if (::lstat(path, &st) == 0) {
+        if (!S_ISREG(st.st_mode))
+            return false;
+        std::snprintf(line, sizeof line,
+                      " %" PRIuMAX " %" PRIuMAX " %u %o %" PRIdMAX " %" PRIdMAX ".%09ld %" PRIdMAX ".%09ld\n",
+                      uintmax_t{st.st_dev}, uintmax_t{st.st_ino}, unsigned{st.st_uid}, unsigned{st.st_mode},
+                      intmax_t{st.st_size}, intmax_t{st.st_mtim.tv_sec}, long{st.st_mtim.tv_nsec},
+                      intmax_t{st.st_ctim.tv_sec}, long{st.st_ctim.tv_nsec});
+    } else if (may_be_missing && errno == ENOENT) {
+        std::strcpy(line, " missing\n");
+    } else {
+        return false;
+    }
+    text.append(path).append(line);
+    return true;
+}
+
+// What a seal that holds says; empty when the stores are incomplete.
+std::string SealText(const StoreFamily &family)
+{
+    std::string text = RunOfTheMachine();
+    for (const StoreRow &store : family.stores)
+        if (!AddLine(text, store.path, false))
+            return {};
+    for (const TextRow &file : family.texts)
+        if (!AddLine(text, file.path, true))
+            return {};
+    return text;
+}
+
+}  // namespace
+
+bool SealHolds(const StoreFamily &family)
+{
+    const Fd fd = OpenFd(family.seal, O_RDONLY | O_NOFOLLOW);
+    struct stat st;
+    if (!fd || ::fstat(fd.Get(), &st) != 0 || !S_ISREG(st.st_mode) || (st.st_mode & 022) != 0 ||
+        (st.st_uid != 0 && st.st_uid != ::geteuid()))
+        return false;
+    const std::string sealed = ReadSmall(fd);
+    return !sealed.empty() && sealed == SealText(family);
+}
+
+void BreakSeal(const StoreFamily &family) noexcept
+{
+    if (::unlink(family.seal) != 0 && errno == EISDIR)
+        ::rmdir(family.seal);
+}
+
+void WriteSeal(const StoreFamily &family) noexcept
+try {
+    KeepErrno keep;
+    BreakSeal(family);
+    const std::string text = SealText(family);
+    if (text.empty())
+        return;
+    const Fd fd = OpenFd(family.seal, O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, 0644);
+    if (!fd || ::fchmod(fd.Get(), 0644) != 0 || !WriteAll(fd.Get(), text))
+        BreakSeal(family);
+} catch (const std::bad_alloc &) {
+}
+
+const StoreFamily *FamilyOfStore(const char *path) noexcept
+{
+    for (const StoreFamily *family : {&kUserFamily, &kGroupFamily})
+        for (const StoreRow &store : family->stores)
+            if (std::strcmp(store.path, path) == 0)
+                return family;
+    return nullptr;
+}
+
+}  // namespace tavo
