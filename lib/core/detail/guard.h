@@ -5,6 +5,7 @@
 #include "core/detail/fault.h"
 
 #include <new>
+#include <stdexcept>
 #include <type_traits>
 
 namespace tavo {
@@ -16,9 +17,7 @@ template <class Body>
 auto Guard(Body &&body, int code = ERR_OUT_OF_MEMORY, Line line = Line{__builtin_LINE()}) noexcept -> decltype(body())
 {
     using Result = decltype(body());
-    try {
-        return body();
-    } catch (const std::bad_alloc &) {
+    const auto out_of_memory = [&]() -> Result {
         if constexpr (std::is_void_v<Result>)
             FailZero(code, line);
         else if constexpr (std::is_pointer_v<Result>)
@@ -27,6 +26,13 @@ auto Guard(Body &&body, int code = ERR_OUT_OF_MEMORY, Line line = Line{__builtin
             return FailZero(code, line);
         else
             return static_cast<Result>(Fail(code, line));
+    };
+    try {
+        return body();
+    } catch (const std::bad_alloc &) {
+        return out_of_memory();
+    } catch (const std::length_error &) {  // a text that would be larger than the address space
+        return out_of_memory();
     }
 }
 

@@ -1,0 +1,159 @@
+// Replaces a file as a whole.
+#include "core/detail/file_rewrite.h"
+
+#include "core/detail/file_target.h"
+#include "core/detail/line_reader.h"
+#include "tavo_error.h"
+
+#include <algorithm>
+#include <new>
+
+#include <sys/xattr.h>
+
+namespace tavo {
+namespace {
+
+constexpr mode_t kPermissions = 07777;
+
+mode_t Umask()
+{
+    const mode_t mask = ::umask(077);  // it can only be read by setting it; for that moment the strictest
+    ::umask(mask);
+    return mask;
+}
+
+// Access lists, security labels and whatever else hangs on the old file. What cannot be copied is left out: not every
+// file system takes them, and the setting is worth more than its label.
+void CopyAttributes(int from, int to) noexcept
+{
+    char names[1024];
+    char value[4096];
+    const ssize_t length = ::flistxattr(from, names, sizeof names);
+    for (const char *name = names; length > 0 && name < names + length; name += std::string_view(name).size() + 1) {
+        const ssize_t size = ::fgetxattr(from, name, value, sizeof value);
+        if (size >= 0)
+            ::fsetxattr(to, name, value, static_cast<size_t>(size), 0);
+    }
+}
+
+bool SyncDirectory(const std::string &path) noexcept
+{
+    const Fd directory = OpenFd(path.c_str(), O_RDONLY | O_DIRECTORY);
+    return directory && SyncFd(directory.Get());
+}
+
+}  // namespace
+
+bool TempFile::CreateBeside(const std::string &target)
+{
+    Remove();
+    path_ = target + ".XXXXXX";
+    fd_.Reset(::mkostemp(path_.data(), O_CLOEXEC));
+    if (!fd_)
+        path_.clear();
+    return static_cast<bool>(fd_);
+}
+
+void TempFile::Adopt(Fd fd, std::string path)
+{
+    Remove();
+    fd_ = std::move(fd);
+    path_ = std::move(path);
+}
+
+bool TempFile::RenameTo(const std::string &target) noexcept
+{
+    if (::rename(path_.c_str(), target.c_str()) != 0)
+        return false;
+    path_.clear();
+    return true;
+}
+
+void TempFile::Remove() noexcept
+{
+    KeepErrno keep;
+    fd_.Reset();
+    if (!path_.empty())
+        ::unlink(path_.c_str());
+    path_.clear();
+}
+
+int FileRewrite::Open(const char *path)
+{
+    target_ = FileTarget(path);
+    if (target_.empty())
+        return ERR_OPEN_FAILED;
+    old_ = OpenFd(target_.c_str(), O_RDONLY | O_NOFOLLOW);
+    missing_ = !old_ && errno == ENOENT;
+    if (!old_)
+        return ERR_OPEN_FAILED;
+    if (::fstat(old_.Get(), &state_) != 0)
+        return ERR_STAT_FAILED;
+    return S_ISREG(state_.st_mode) ? 0 : ERR_OPEN_FAILED;
+}
+
+bool FileRewrite::Read(std::string &text)
+{
+    // The size is a hint: files under /proc have none, others may grow.
+    const auto hint = static_cast<size_t>(std::clamp<off_t>(state_.st_size, 0, kLargestText));
+    text.resize(std::max<size_t>(hint + 1, 4096));
+    for (size_t length = 0;;) {
+        if (length == text.size()) {
+            if (length > kLargestText)
+                throw std::bad_alloc();
+            text.resize(length * 2);
+        }
+        const ssize_t got = ::read(old_.Get(), text.data() + length, text.size() - length);
+        if (got < 0 && errno == EINTR)
+            continue;
+        length += got > 0 ? static_cast<size_t>(got) : 0;
+        if (got <= 0) {
+            text.resize(length);
+            return got == 0;
+        }
+    }
+}
+
+bool FileRewrite::Complete(TempFile &temp, std::string_view text, mode_t mode_of_new) noexcept
+{
+    const int fd = temp.Descriptor();
+    if (!WriteAll(fd, text))
+        return false;
+    if (missing_) {
+        if (::fchmod(fd, mode_of_new & ~Umask()) != 0)
+            return false;
+    } else {
+        struct stat made;
+        if (::fstat(fd, &made) != 0)
+            return false;
+        const bool same_owner = made.st_uid == state_.st_uid && made.st_gid == state_.st_gid;
+        if (!same_owner && ::fchown(fd, state_.st_uid, state_.st_gid) != 0)
+            return false;
+        CopyAttributes(old_.Get(), fd);
+        if (::fchmod(fd, state_.st_mode & kPermissions) != 0)
+            return false;
+    }
+    // Last, so that the one sync covers owner and mode too.
+    return SyncFd(fd) && temp.Close();
+}
+
+int FileRewrite::ReplaceBy(TempFile &temp, std::string_view text, mode_t mode_of_new)
+{
+    const std::string directory = DirectoryOf(target_);
+    if (!Complete(temp, text, mode_of_new))
+        return ERR_WRITE_FAILED;
+    if (!temp.RenameTo(target_))
+        return ERR_RENAME_FAILED;
+    directory_synced_ = SyncDirectory(directory);
+    return 0;
+}
+
+int FileRewrite::Replace(std::string_view text, mode_t mode_of_new)
+{
+    TempFile temp;
+    if (!temp.CreateBeside(target_))
+        return ERR_OPEN_FAILED;
+    return ReplaceBy(temp, text, mode_of_new);
+}
+
+}  // namespace tavo

@@ -1,0 +1,65 @@
+// One line of a settings file: what sets a key, and to what. Pure text; a line may carry its newline or not.
+#ifndef TAVO_CORE_DETAIL_KEY_VALUE_LINE_H
+#define TAVO_CORE_DETAIL_KEY_VALUE_LINE_H
+
+#include <optional>
+#include <string_view>
+
+namespace tavo {
+
+inline constexpr std::string_view kWhiteSpace = "\t\n\r ";
+
+constexpr bool IsWhiteSpace(char byte)
+{
+    return kWhiteSpace.find(byte) != std::string_view::npos;
+}
+
+// Takes white space off both ends, then one pair of double quotes that encloses the rest.
+std::string_view TrimSetting(std::string_view text);
+
+constexpr bool IsCommentLine(std::string_view line)
+{
+    return line.starts_with('#') || line.starts_with(';');
+}
+
+// The key that a line sets; empty when it sets none. Doubled and leading "=" are passed over, as ever: "=x" sets x.
+std::string_view LineKey(std::string_view line);
+
+// The value of a line that sets a key.
+std::string_view LineValue(std::string_view line);
+
+// Whether a line sets the key. The first byte that may belong to a key decides most lines.
+inline bool LineSetsKey(std::string_view line, std::string_view key)
+{
+    constexpr std::string_view around_key = "=\"\t\n\r ";
+    if (key.empty())
+        return false;
+    if (around_key.find(key[0]) == around_key.npos) {
+        size_t at = 0;
+        while (at < line.size() && around_key.find(line[at]) != around_key.npos)
+            ++at;
+        if (at == line.size() || line[at] != key[0])
+            return false;
+    }
+    return LineKey(line) == key;
+}
+
+struct KeyValue {
+    std::string_view key;
+    std::string_view value;
+};
+
+// Splits at any of the separators: the first token that is not empty is the key, the rest of the line the value, both
+// trimmed. Empty for comments and for lines that lack one of the two.
+std::optional<KeyValue> SplitLine(std::string_view line, std::string_view separators);
+
+// Splits at the first "="; the value may be empty. Empty for comments and for lines without a key.
+std::optional<KeyValue> SplitAtEqualSign(std::string_view line);
+
+// Whether a key that is written can be found again, and neither of the two makes lines of its own.
+bool IsWritableKey(std::string_view key);
+bool IsWritableValue(std::string_view value);
+
+}  // namespace tavo
+
+#endif

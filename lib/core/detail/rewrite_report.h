@@ -1,0 +1,49 @@
+// How an exported function rewrites a file and reports what went wrong, under its own module name.
+#ifndef TAVO_CORE_DETAIL_REWRITE_REPORT_H
+#define TAVO_CORE_DETAIL_REWRITE_REPORT_H
+
+#include "core/detail/fault.h"
+#include "core/detail/file_rewrite.h"
+#include "core/detail/guard.h"
+#include "core/detail/log.h"
+
+#include <optional>
+
+namespace tavo {
+namespace {
+
+// 0, or -1 with the code set.
+[[maybe_unused]] int ReplaceOrFail(FileRewrite &rewrite, std::string_view text, Line line = Line{__builtin_LINE()})
+{
+    if (const int code = rewrite.Replace(text))
+        return Fail(code, line);
+    if (!rewrite.IsDirectorySynced())
+        LogError({"%s:%d Failed to sync the directory of %s, errno=%d", line.number}, rewrite.Target(), errno);
+    return 0;
+}
+
+// Rewrites a file by an edit of its whole text. The edit takes the old text and gives the new one, or nothing when the
+// line or key that it is about is not there. 1, 0 with ERR_KEY_NOT_FOUND, -1 with another code.
+template <class Edit>
+int RewriteText(const char *path, Edit &&edit, Line line = Line{__builtin_LINE()})
+{
+    return Guard(
+        [&] {
+            FileRewrite rewrite;
+            std::string text;
+            if (const int code = rewrite.Open(path))
+                return Fail(code, line);
+            if (!rewrite.Read(text))
+                return Fail(ERR_WRITE_FAILED, line);  // the code of everything between open and rename
+            const std::optional<std::string> changed = edit(std::string_view(text));
+            if (!changed)
+                return static_cast<int>(FailZero(ERR_KEY_NOT_FOUND, line));
+            return ReplaceOrFail(rewrite, *changed, line) == 0 ? 1 : -1;
+        },
+        ERR_OUT_OF_MEMORY, line);
+}
+
+}  // namespace
+}  // namespace tavo
+
+#endif
