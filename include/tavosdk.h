@@ -6,6 +6,8 @@
 
 #include "tavo_bdb.h"
 #include "tavo_error.h"
+#include "tavo_lock.h"
 #include "tavo_net.h"
+#include "tavo_proc.h"
 
 #endif

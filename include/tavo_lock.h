@@ -1,0 +1,116 @@
+/*
+ * Advisory locks: the lock files by which all programs of the appliance take turns at its shared system files.
+ *
+ * A program takes the locks of the files that it is about to read or change, works, and releases them:
+ *
+ *     if (ErrTLIBFileLock(TAVO_LOCK_TAVOINFO | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING, 5) != 0)
+ *         return -1;
+ *     ...
+ *     ErrTLIBFileUnlock(TAVO_LOCK_TAVOINFO);
+ *
+ * Locks nest within one process: each is released by as many unlocks as there were locks. Locks of different processes
+ * exclude each other, threads of one process do not. A process that ends, however it ends, holds nothing any more.
+ *
+ * The locks are flock(2) locks on the files /tmp/lock/lock_*. They belong to the open file, which a forked child shares:
+ * a child calls ErrTLIBFileCloseLock or ErrTLIBFileResetLock first and never ErrTLIBFileUnlock, which would free what
+ * its parent holds. Programs that are executed inherit nothing, the files are close-on-exec.
+ *
+ * Anyone who may log in to the appliance may read the lock files and so hold up those who change settings; the lock
+ * files guard against accidents among the appliance's own programs.
+ */
+#ifndef TAVO_LOCK_H
+#define TAVO_LOCK_H
+
+#include "tavo_error.h"
+
+#include <stdio.h>
+
+TAVO_BEGIN_DECLS
+
+/*
+ * A request combines the locks that are wanted with one way to take them. A request for several locks takes all or none.
+ *
+ * TAVO_LOCK_HOST is what the settings of the network interfaces are edited under; TAVO_LOCK_NETWORK is another lock.
+ * The services take TAVO_LOCK_TAVOINFO, TAVO_LOCK_SMB and TAVO_LOCK_APPLE together and hold them while start-up scripts
+ * run: such a script must not run a program that takes one of these locks, it would wait until its time-out.
+ */
+/* clang-format off */
+enum {
+    TAVO_LOCK_SHARED       = 0x1,      /* with other holders that share */
+    TAVO_LOCK_EXCLUSIVE    = 0x2,      /* alone */
+    TAVO_LOCK_NONBLOCKING  = 0x4,      /* added to one of the two: the time-out counts; without it a wait has no end */
+
+    TAVO_LOCK_USER         = 0x10,     /* lock_pw */
+    TAVO_LOCK_GROUP        = 0x20,     /* lock_gr */
+    TAVO_LOCK_SMB          = 0x40,     /* lock_smb */
+    TAVO_LOCK_RC           = 0x80,     /* lock_rc */
+    TAVO_LOCK_HOST         = 0x100,    /* lock_host */
+    TAVO_LOCK_EXPORTS      = 0x200,    /* lock_exports */
+    TAVO_LOCK_NETWORK      = 0x400,    /* lock_nw */
+    TAVO_LOCK_TAVOINFO     = 0x800,    /* lock_tavoinfo: /etc/tavoinfo.conf */
+    TAVO_LOCK_APPLE        = 0x1000,   /* lock_apple */
+    TAVO_LOCK_SNMP         = 0x2000,   /* lock_snmp */
+    TAVO_LOCK_WIN          = 0x4000,   /* lock_win */
+    TAVO_LOCK_TAPE_BACKUP  = 0x8000,   /* lock_tapebkp */
+    TAVO_LOCK_CONNECT      = 0x10000,  /* lock_connect */
+    TAVO_LOCK_USB_ID_MAP   = 0x20000,  /* lock_usbidmap */
+    TAVO_LOCK_DOMAIN_UID   = 0x40000,  /* lock_duseruid */
+    TAVO_LOCK_DOMAIN_GID   = 0x80000,  /* lock_dusergid */
+    TAVO_LOCK_FSTAB        = 0x100000, /* lock_fstab */
+    TAVO_LOCK_HOTSWAP      = 0x200000, /* lock_hotswap */
+    TAVO_LOCK_SPACE        = 0x400000, /* lock_space */
+    TAVO_LOCK_TTYS1        = 0x800000  /* lock_ttys1 */
+};
+/* clang-format on */
+
+/* One lock as this process holds it. */
+typedef struct TLIBLOCKFILE {
+    FILE *pfLock;          /* the open lock file while this process holds the lock, else NULL */
+    const char *szPath;    /* the lock file */
+    unsigned int fLockBit; /* the lock's bit in a request; 0 ends the table */
+    int nRef;              /* how many unlocks it takes to release it */
+    int nMode;             /* how the lock was taken: the low four bits of that request */
+} TLIBLOCKFILE;
+
+/* The locks of this process, in the order in which a request takes them. The last record has an empty path and the bit
+ * 0. For looking at: a program that writes to it breaks its own locks, and nobody else's. */
+extern TAVO_API TLIBLOCKFILE rgslckList[21];
+
+/* Takes every lock of the request, first those that stand earlier in rgslckList. A lock that this process holds already
+ * is counted once more, whatever the mode of the request, except that a shared one does not become exclusive: such a
+ * request fails at once and changes nothing.
+ * timeout: seconds for which a request with TAVO_LOCK_NONBLOCKING is tried again, every 50 milliseconds (20 times a
+ * second); 0 or less means one attempt.
+ * Creates /tmp/lock (mode 0755) and the lock files (mode 0644) when they are missing. A lock file that was replaced
+ * while it was waited for (by a cleaner of /tmp) is opened again, so that all holders hold the same file.
+ * Returns 0, or -1 with nothing taken and
+ *   ERR_LOCK_FAILED    not all of the locks could be had in time, a shared lock would have to become exclusive, or the
+ *                      request names no way or an impossible one to take them
+ *   ERR_CREATE_FAILED, ERR_OPEN_FAILED  as ErrTLIBILockCheckDir */
+TAVO_API int ErrTLIBFileLock(unsigned int request, int timeout);
+
+/* Releases the locks of mask that this process holds, each once; the low four bits do not count, so the request itself
+ * will do. Locks that are not held are passed over.
+ * Returns 0, or -1 with ERR_UNLOCK_FAILED when the kernel refused to unlock a file; it is closed all the same. */
+TAVO_API int ErrTLIBFileUnlock(unsigned int mask);
+
+/* For a freshly forked child: closes every lock file and forgets every count. The parent keeps its locks.
+ * Returns 0, or -1 with ERR_UNLOCK_FAILED when a close failed; all are closed all the same. */
+TAVO_API int ErrTLIBFileCloseLock(void);
+
+/* For a freshly forked child that takes over some of its parent's locks: those of mask are counted once, all others
+ * are closed and forgotten. Of a lock that is taken over, the file stays locked until both processes have closed it.
+ * Returns 0, or -1 with ERR_UNLOCK_FAILED when a close failed; all are closed all the same. */
+TAVO_API int ErrTLIBFileResetLock(unsigned int mask);
+
+/* Creates /tmp/lock and every lock file that is missing. ErrTLIBFileLock does so itself.
+ * Everybody may create names in /tmp, so the directory must belong to root or to the caller and be writable to its owner
+ * alone, and a lock file must be a regular file of one of the two; a symbolic link is never followed.
+ * Returns 0, or -1 with
+ *   ERR_CREATE_FAILED  /tmp/lock cannot be created, is no directory, or is not to be trusted
+ *   ERR_OPEN_FAILED    a lock file cannot be created, is no regular file, or is not to be trusted */
+TAVO_API int ErrTLIBILockCheckDir(void);
+
+TAVO_END_DECLS
+
+#endif
