@@ -106,8 +106,9 @@ TAVO_API TLIBSZHASH *PshTLIBICheckSpace(TLIBSZHASH *pHash, int cbNeed);
  * block as it was: no memory, or the pairs do not fit. */
 TAVO_API TLIBSZHASH *PshTLIBIReSizeHash(TLIBSZHASH *pHash, int nSlot, int cbStr);
 
-/* Adds every pair of pFrom to pTo, in slot order, without growing pTo; a key that pTo holds gets the new value.
- * Returns 0; -1: an argument is NULL, or pTo is too small; it then holds the pairs before that one too. */
+/* Adds every pair of pFrom to pTo, in slot order, without growing pTo.
+ * Returns 0; -1: an argument is NULL, or a pair does not fit or its key is there already; the pairs before that one
+ * have been added. */
 TAVO_API int TLIBICopyHash(TLIBSZHASH *pTo, const TLIBSZHASH *pFrom);
 
 /* Stores a new pair in the slot, which holds none, without growing. Returns the slot; -1: an argument is NULL, the slot

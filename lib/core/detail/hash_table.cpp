@@ -1,0 +1,245 @@
+// The table of a string hash: where a key stands, how a pair is stored, how the block grows.
+#include "core/detail/hash_table.h"
+
+#include "core/detail/text_overlap.h"
+
+#include <bit>
+#include <climits>
+#include <cstdlib>
+#include <cstring>
+
+namespace tavo {
+namespace {
+
+static_assert(std::endian::native == std::endian::little, "the words of a key are read as they stand in memory");
+
+uint32_t WordSum(std::string_view key)
+{
+    uint32_t sum = 0;
+    size_t left = key.size();
+    const char *at = key.data();
+    for (; left >= 4; left -= 4, at += 4) {
+        uint32_t word;
+        std::memcpy(&word, at, 4);
+        sum += word;
+    }
+    uint32_t last = 0;
+    std::memcpy(&last, at, left);
+    return sum + last;
+}
+
+// A division by a number known to the compiler is a multiplication; these are the tables that every hash begins with.
+uint32_t Modulo(uint32_t sum, uint32_t slots)
+{
+    switch (slots) {
+    case 31:
+        return sum % 31;
+    case 119:
+        return sum % 119;
+    case 471:
+        return sum % 471;
+    case 1879:
+        return sum % 1879;
+    case 7511:
+        return sum % 7511;
+    default:
+        return sum % slots;
+    }
+}
+
+int Next(const TLIBSZHASH *hash, int slot)
+{
+    return slot + 1 == hash->nSlot ? 0 : slot + 1;
+}
+
+bool Holds(const TLIBSZHASHSLOT &slot, std::string_view key)
+{
+    return std::strcmp(slot.pszKey, key.data()) == 0;
+}
+
+// The place of a key that the hash does not hold, in a table without removed pairs.
+int FirstFreeSlot(const TLIBSZHASH *hash, std::string_view key)
+{
+    const int home = HomeSlot(key, hash->nSlot);
+    int slot = home;
+    while (slot >= 0 && IsPair(hash->slots[slot])) {
+        slot = Next(hash, slot);
+        if (slot == home)
+            return -1;
+    }
+    return slot;
+}
+
+char *StoreText(TLIBSZHASH *hash, std::string_view text)
+{
+    char *stored = hash->pszNextStr;
+    std::memmove(stored, text.data(), text.size());
+    stored[text.size()] = '\0';
+    hash->pszNextStr += text.size() + 1;
+    hash->nStrFree -= static_cast<int32_t>(text.size() + 1);
+    return stored;
+}
+
+}  // namespace
+
+char *StringArea(TLIBSZHASH *hash) noexcept
+{
+    return reinterpret_cast<char *>(hash->slots + hash->nSlot);
+}
+
+int HomeSlot(std::string_view key, int slots) noexcept
+{
+    return slots > 0 ? static_cast<int>(Modulo(WordSum(key), static_cast<uint32_t>(slots))) : -1;
+}
+
+int FindPair(const TLIBSZHASH *hash, std::string_view key) noexcept
+{
+    const int home = HomeSlot(key, hash->nSlot);
+    if (home < 0)
+        return -1;
+    int slot = home;
+    do {
+        const TLIBSZHASHSLOT &at = hash->slots[slot];
+        if (IsPair(at)) {
+            if (Holds(at, key))
+                return slot;
+        } else if (IsNeverUsed(at)) {
+            return -1;
+        }
+        slot = Next(hash, slot);
+    } while (slot != home);
+    return -1;
+}
+
+Place FindPlace(const TLIBSZHASH *hash, std::string_view key) noexcept
+{
+    const int home = HomeSlot(key, hash->nSlot);
+    if (home < 0)
+        return {};
+    const TLIBSZHASHSLOT &first = hash->slots[home];
+    if (IsNeverUsed(first) || (IsPair(first) && Holds(first, key)))
+        return {home, -1};
+    Place place;
+    if (!IsPair(first))
+        place.spare = home;
+    for (int slot = Next(hash, home); slot != home; slot = Next(hash, slot)) {
+        const TLIBSZHASHSLOT &at = hash->slots[slot];
+        if (IsPair(at)) {
+            if (Holds(at, key))
+                return {slot, -1};
+        } else if (!IsNeverUsed(at)) {
+            if (place.usual < 0)
+                place.usual = slot;
+        } else {
+            if (place.spare < 0)
+                place.spare = slot;
+            break;
+        }
+    }
+    return place;
+}
+
+TLIBSZHASH *NewHash(int64_t slots, int64_t string_bytes) noexcept
+{
+    if (slots < 0 || slots > INT_MAX || string_bytes < 0 || string_bytes > INT_MAX)
+        return nullptr;
+    const uint64_t bytes = sizeof(TLIBSZHASH) + static_cast<uint64_t>(slots) * sizeof(TLIBSZHASHSLOT) +
+                           static_cast<uint64_t>(string_bytes);
+    if (bytes > PTRDIFF_MAX)
+        return nullptr;
+    auto *hash = static_cast<TLIBSZHASH *>(std::calloc(1, static_cast<size_t>(bytes)));
+    if (!hash)
+        return nullptr;
+    hash->nStrSize = static_cast<int32_t>(string_bytes);
+    hash->nStrFree = hash->nStrSize;
+    hash->nSlot = static_cast<int32_t>(slots);
+    hash->pszNextStr = StringArea(hash);
+    return hash;
+}
+
+TLIBSZHASH *CopyToNewHash(const TLIBSZHASH *hash, int64_t slots, int64_t string_bytes) noexcept
+{
+    if (slots < hash->nPair)
+        return nullptr;
+    HashOwner copy(NewHash(slots, string_bytes));
+    if (!copy)
+        return nullptr;
+    for (int slot = 0; slot < hash->nSlot; ++slot) {
+        if (!IsPair(hash->slots[slot]))
+            continue;
+        const std::string_view key(hash->slots[slot].pszKey);
+        const std::string_view value(hash->slots[slot].pszValue);
+        // The keys differ from each other and nothing has been removed yet, so no key needs comparing.
+        const int free_slot = FirstFreeSlot(copy.Get(), key);
+        if (free_slot < 0 || PairBytes(key, value) > copy->nStrFree || !StorePair(copy.Get(), free_slot, key, value))
+            return nullptr;
+    }
+    return copy.Release();
+}
+
+bool MakeHashRoom(TLIBSZHASH **hash, int64_t bytes, HashOwner &left) noexcept
+{
+    const TLIBSZHASH *old = *hash;
+    const int free_slots = old->nSlot - old->nPair;
+    const float free_ratio = static_cast<float>(free_slots) / static_cast<float>(old->nSlot);
+    const int64_t slots = free_ratio < 0.25F ? int64_t{4} * old->nSlot - 5 : old->nSlot;
+    int64_t string_bytes = old->nStrSize;
+    if (old->nStrFree <= bytes) {
+        const int64_t average = old->nPair > 0 ? old->nStrSize / old->nPair : bytes;
+        string_bytes += average * free_slots + bytes;
+    } else if (slots == old->nSlot) {
+        return true;
+    }
+    TLIBSZHASH *grown = CopyToNewHash(old, slots, string_bytes);
+    if (!grown)
+        return false;
+    left.Reset(*hash);
+    *hash = grown;
+    return true;
+}
+
+bool StorePair(TLIBSZHASH *hash, int slot, std::string_view key, std::string_view value) noexcept
+{
+    HeapBlock<char> kept;
+    // A text that the hash has given up may stand just where the key goes.
+    if (Overlap(hash->pszNextStr, key.size() + 1, value.data(), value.size() + 1)) {
+        kept.reset(::strdup(value.data()));
+        if (!kept)
+            return false;
+        value = {kept.get(), value.size()};
+    }
+    hash->slots[slot].pszKey = StoreText(hash, key);
+    hash->slots[slot].pszValue = StoreText(hash, value);
+    ++hash->nPair;
+    return true;
+}
+
+int InsertNewPair(TLIBSZHASH **hash, int slot, std::string_view key, std::string_view value) noexcept
+{
+    HashOwner left;
+    if ((*hash)->nSlot == 0 || !MakeHashRoom(hash, PairBytes(key, value), left))
+        return -1;
+    if (left)
+        slot = FirstFreeSlot(*hash, key);
+    if (slot < 0 || !StorePair(*hash, slot, key, value))
+        return -1;
+    return slot;
+}
+
+int UpdateValue(TLIBSZHASH **hash, int slot, std::string_view key, std::string_view value) noexcept
+{
+    char *old_value = (*hash)->slots[slot].pszValue;
+    if (value.size() <= std::strlen(old_value)) {
+        std::memmove(old_value, value.data(), value.size() + 1);
+        return slot;
+    }
+    HashOwner left;
+    if (!MakeHashRoom(hash, static_cast<int64_t>(value.size()) + 1, left))
+        return -1;
+    if (left)
+        slot = FindPair(*hash, key);
+    (*hash)->slots[slot].pszValue = StoreText(*hash, value);
+    return slot;
+}
+
+}  // namespace tavo

@@ -1,0 +1,13 @@
+// Makes an empty hash of the usual size.
+#include "tavo_hash.h"
+
+namespace {
+
+constexpr int kFirstSlots = 31;
+
+}  // namespace
+
+extern "C" TLIBSZHASH *PshTLIBSzHashAlloc(int cbStr)
+{
+    return PshTLIBIHashAllocator(kFirstSlots, cbStr);
+}

@@ -1,0 +1,9 @@
+// Frees a hash.
+#include "tavo_hash.h"
+
+#include <cstdlib>
+
+extern "C" void TLIBSzHashFree(TLIBSZHASH *pHash)
+{
+    std::free(pHash);
+}

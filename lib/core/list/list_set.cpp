@@ -1,0 +1,31 @@
+// Replaces one item of a list.
+#include "tavo_list.h"
+
+#include "core/detail/fault.h"
+#include "core/detail/list_block.h"
+
+#include <cstring>
+
+extern "C" int TLIBSzListSet(TLIBSZLIST **ppList, int i, const char *sz)
+{
+    if (!ppList || !tavo::HasItem(*ppList, i) || !sz)
+        return Fail(ERR_BAD_PARAMETERS);
+    const size_t length = std::strlen(sz);
+    // In place it goes over the old text. A hole has no text, so only "" ever lands on the empty string that all
+    // holes share.
+    if (length > std::strlen((*ppList)->pszItem[i])) {
+        tavo::ListOwner left;
+        if (!tavo::MakeListRoom(ppList, static_cast<int64_t>(length) + 1, left))
+            return Fail(ERR_OUT_OF_MEMORY);
+        (*ppList)->pszItem[i] = tavo::StoreString(*ppList, sz, length);
+    } else {
+        std::memmove((*ppList)->pszItem[i], sz, length + 1);
+    }
+    TLIBSZLIST *list = *ppList;
+    if (!tavo::IsSorted(list))
+        return i;
+    const char *stored = list->pszItem[i];
+    tavo::SortItems(list, list->fMode);
+    // For a list sorted without regard to case this refuses, as callers know it, after the item has been replaced.
+    return TLIBSzListFind(list, stored);
+}

@@ -1,0 +1,17 @@
+// Keeps the items of a list that another list does not hold.
+#include "tavo_list.h"
+
+#include "core/detail/fault.h"
+#include "core/detail/list_match.h"
+
+extern "C" TLIBSZLIST *PslTLIBSzListSub(TLIBSZLIST *pA, const TLIBSZLIST *pB, int fFlags)
+{
+    if (!pA || !pB)
+        return FailNull(ERR_BAD_PARAMETERS, Line{58});
+    if (!tavo::CanMatch(pA, pB))
+        return FailNull(ERR_BAD_PARAMETERS, Line{68});
+    if (fFlags & ~TLIB_SZLIST_NEW)
+        return FailNull(ERR_BAD_PARAMETERS);
+    TLIBSZLIST *selected = tavo::SelectItems(pA, pB, fFlags == TLIB_SZLIST_NEW, false);
+    return selected ? selected : FailNull(ERR_OUT_OF_MEMORY);
+}

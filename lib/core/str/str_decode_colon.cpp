@@ -1,0 +1,42 @@
+// Decodes a field of a line of colon-separated fields.
+#include "tavo_str.h"
+
+#include "core/detail/colon_code.h"
+#include "core/detail/fault.h"
+#include "core/detail/text_overlap.h"
+
+#include <climits>
+
+namespace {
+
+// The first byte of the text as it was before encoding; the text moves on.
+char NextDecoded(std::string_view &text)
+{
+    const tavo::ColonCode *code = tavo::CodeAt(text);
+    const char plain = code ? code->plain : text.front();
+    text.remove_prefix(code ? code->encoded.size() : 1);
+    return plain;
+}
+
+}  // namespace
+
+extern "C" int TLIBStrDecodeColon(const char *szSrc, char *szDst, int cbDst)
+{
+    if (!szSrc || cbDst < 0 || (!szDst && cbDst != 0))
+        return Fail(ERR_BAD_PARAMETERS);
+    const std::string_view text(szSrc);
+    if (szDst && szDst != szSrc && tavo::Overlap(szSrc, text.size() + 1, szDst, static_cast<size_t>(cbDst)))
+        return Fail(ERR_BAD_PARAMETERS);
+    size_t length = 1;
+    for (std::string_view rest = text; !rest.empty(); ++length)
+        NextDecoded(rest);
+    if (length > INT_MAX || (szDst && length > static_cast<size_t>(cbDst)))
+        return Fail(ERR_NOT_ENOUGH_MEMORY);
+    if (szDst) {
+        // Never longer than what it was read from, so in place nothing is overwritten before it is read.
+        for (std::string_view rest = text; !rest.empty(); ++szDst)
+            *szDst = NextDecoded(rest);
+        *szDst = '\0';
+    }
+    return static_cast<int>(length);
+}
