@@ -24,7 +24,7 @@
 TAVO_BEGIN_DECLS
 
 /*
- * The codes that have a text: code / 0x100 is the index into rgszErrMsg, the low byte is always 0.
+ * The codes: code / 0x100 is the index into rgszErrMsg, the low byte is always 0.
  */
 /* clang-format off */
 enum {
@@ -112,11 +112,9 @@ enum {
     ERR_UNKNOWN                 = 0x8000,
     ERR_SYS_UNKNOWN             = 0x8100,
     ERR_VOLUME_SIZE_TOO_LARGE   = 0x8200,
-    ERR_YP_BIND                 = 0x9000
-};
+    ERR_YP_BIND                 = 0x9000,
 
-/* The codes that have no text in rgszErrMsg: their slot holds "", or lies past the end of the table. */
-enum {
+    /* The codes that have no text in rgszErrMsg: their slot holds "", or lies past the end of the table. */
     ERR_REMOVE_FAILED           = 0x3900, /* removing files or directories failed */
     ERR_MOVE_FAILED             = 0x3A00, /* moving a directory tree failed */
     ERR_COPY_FAILED             = 0x3B00, /* copying files failed */
