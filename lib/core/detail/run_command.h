@@ -1,0 +1,25 @@
+// Runs a composed command line through the shell and gives its exit status.
+//
+// Whatever the caller's environment, the command runs with PATH=/usr/sbin:/usr/bin:/sbin:/bin and LC_ALL=C, with
+// /dev/null as standard input, standard output and error of the caller's, no other descriptor, and default signals.
+#ifndef TAVO_CORE_DETAIL_RUN_COMMAND_H
+#define TAVO_CORE_DETAIL_RUN_COMMAND_H
+
+#include <string>
+
+#include <sys/types.h>
+
+namespace tavo {
+
+// The exit status, 0 to 255; -1 when the command could not be run or was killed by a signal. Throws bad_alloc.
+int RunCommand(const std::string &command);
+
+// The same with /dev/null as standard output and error: for commands that complain where that is no failure.
+int RunCommandQuietly(const std::string &command);
+
+// Starts the command; `output` and `error` are descriptors above 2, kNullDevice or kInherited. -1 with errno.
+pid_t StartCommand(const std::string &command, int output, int error);
+
+}  // namespace tavo
+
+#endif

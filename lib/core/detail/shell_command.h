@@ -1,0 +1,53 @@
+// Composes command lines for the shell from fixed formats.
+//
+// An argument of plain characters goes in as it is, so that the command is byte for byte the one that administrators
+// find in logs and write in scripts; any other is quoted, so that no name, path or address becomes shell syntax.
+//
+//     ShellCommand("/sbin/pvresize %s > /dev/null 2>&1", device)
+#ifndef TAVO_CORE_DETAIL_SHELL_COMMAND_H
+#define TAVO_CORE_DETAIL_SHELL_COMMAND_H
+
+#include "core/detail/text_format.h"
+
+#include <initializer_list>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <type_traits>
+
+namespace tavo {
+
+// A piece of the command that the library itself composed, such as a fixed option or a list of quoted devices: it goes in
+// unquoted and may start with "-". Never for text from outside.
+struct ComposedPiece {
+    std::string_view text;
+};
+
+std::optional<std::string> ComposeShellCommand(const char *format, std::initializer_list<TextArg> args,
+                                               std::initializer_list<bool> composed);
+
+inline TextArg AsTextArg(const ComposedPiece &piece)
+{
+    return piece.text;
+}
+
+template <class Value>
+TextArg AsTextArg(const Value &value)
+{
+    return value;
+}
+
+// Formats as FormatText does; "%s" may stand within single quotes. Empty when a text argument starts with "-", where a
+// program would take it for an option, or holds a NUL byte. Throws bad_alloc.
+template <class... Args>
+std::optional<std::string> ShellCommand(const char *format, const Args &...args)
+{
+    return ComposeShellCommand(format, {AsTextArg(args)...}, {std::is_same_v<Args, ComposedPiece>...});
+}
+
+// The text as one word of the shell: itself when all its characters are plain, else quoted.
+std::string ShellQuoted(std::string_view text);
+
+}  // namespace tavo
+
+#endif

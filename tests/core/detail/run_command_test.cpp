@@ -1,0 +1,173 @@
+// Running commands: status, surroundings, what is left behind.
+#include "core/detail/run_command.h"
+
+#include "core/detail/command_output.h"
+#include "support/scratch_dir.h"
+
+#include <gtest/gtest.h>
+
+#include <csignal>
+#include <cstdlib>
+#include <filesystem>
+#include <string>
+#include <vector>
+
+#include <fcntl.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+using tavo::CommandOutput;
+using tavo::RunCommand;
+
+namespace {
+
+std::vector<std::string> LinesOf(const std::string &command)
+{
+    std::vector<std::string> lines;
+    CommandOutput output(command);
+    for (std::string line; output.Next(line);)
+        lines.push_back(line);
+    EXPECT_EQ(output.Status(), 0) << command;
+    return lines;
+}
+
+int StatusOf(const std::string &command)
+{
+    CommandOutput output(command);
+    return output.Status();
+}
+
+size_t OpenDescriptors()
+{
+    size_t count = 0;
+    for ([[maybe_unused]] const auto &entry : std::filesystem::directory_iterator("/proc/self/fd"))
+        ++count;
+    return count;
+}
+
+void OnChild(int)
+{
+}
+
+// The action of SIGCHLD for a scope.
+class ChildAction {
+  public:
+    ChildAction(void (*handler)(int), int flags)
+    {
+        struct sigaction action = {};
+        action.sa_handler = handler;
+        action.sa_flags = flags;
+        ::sigaction(SIGCHLD, &action, &saved_);
+    }
+    ~ChildAction() { ::sigaction(SIGCHLD, &saved_, nullptr); }
+
+  private:
+    struct sigaction saved_;
+};
+
+TEST(RunCommand, StatusWhateverTheCallerDoesWithItsChildren)
+{
+    const struct {
+        const char *command;
+        int status;
+    } rows[] = {{"true", 0}, {"exit 3", 3}, {"exit 255", 255}, {"kill -9 $$", -1}, {"/nonexistent 2>/dev/null", 127}};
+    const struct {
+        void (*handler)(int);
+        int flags;
+    } actions[] = {{SIG_DFL, 0}, {SIG_IGN, 0}, {SIG_DFL, SA_NOCLDWAIT}, {OnChild, 0}, {OnChild, SA_NOCLDWAIT}};
+    for (const auto &action : actions) {
+        const ChildAction set(action.handler, action.flags);
+        for (const auto &row : rows) {
+            EXPECT_EQ(RunCommand(row.command), row.status) << row.command;
+            EXPECT_EQ(StatusOf(row.command), row.status) << row.command;
+        }
+        struct sigaction left;
+        ::sigaction(SIGCHLD, nullptr, &left);
+        EXPECT_EQ(left.sa_handler, action.handler);
+        EXPECT_EQ(left.sa_flags & SA_NOCLDWAIT, action.flags);
+    }
+}
+
+// A caller that ignores SIGCHLD never waits: what ended while a command ran must not stay behind as a zombie.
+TEST(RunCommand, LeavesNoZombieOfAnIgnoringCaller)
+{
+    const ChildAction ignore(SIG_IGN, 0);
+    const pid_t other = ::fork();
+    if (other == 0) {
+        ::usleep(50000);
+        ::_exit(7);
+    }
+    EXPECT_EQ(RunCommand("sleep 0.2; exit 4"), 4);
+    EXPECT_EQ(::kill(other, 0), -1);
+}
+
+TEST(RunCommand, FixedPathAndLocaleAndNothingInherited)
+{
+    ::setenv("PATH", "/nowhere", 1);
+    ::setenv("LC_ALL", "tlh", 1);
+    ::setenv("KEPT", "yes", 1);
+    ::signal(SIGPIPE, SIG_IGN);
+    sigset_t mask;
+    sigemptyset(&mask);
+    sigaddset(&mask, SIGUSR1);
+    ::sigprocmask(SIG_BLOCK, &mask, nullptr);
+    const int leaky = ::open("/etc/passwd", O_RDONLY);  // not close-on-exec
+
+    EXPECT_EQ(LinesOf("echo $PATH $LC_ALL $KEPT"), std::vector<std::string>{"/usr/sbin:/usr/bin:/sbin:/bin C yes"});
+    EXPECT_EQ(LinesOf("readlink /proc/self/fd/0; test -e /proc/self/fd/" + std::to_string(leaky) + " || echo none"),
+              (std::vector<std::string>{"/dev/null", "none"}));
+    EXPECT_EQ(LinesOf("grep -E '^Sig(Blk|Ign)' /proc/self/status"),
+              (std::vector<std::string>{"SigBlk:\t0000000000000000", "SigIgn:\t0000000000000000"}));
+
+    ::close(leaky);
+    ::sigprocmask(SIG_UNBLOCK, &mask, nullptr);
+    ::signal(SIGPIPE, SIG_DFL);
+}
+
+TEST(RunCommand, ThousandRunsLeaveNothing)
+{
+    const size_t before = OpenDescriptors();
+    for (int i = 0; i < 334; ++i) {
+        RunCommand("exit 1");
+        StatusOf("echo x; exit 1");
+        CommandOutput unread("yes");
+    }
+    EXPECT_EQ(OpenDescriptors(), before);
+    EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1);
+    EXPECT_EQ(errno, ECHILD);
+}
+
+TEST(CommandOutput, Lines)
+{
+    const std::string longer(10000, 'x');
+    EXPECT_EQ(LinesOf("printf 'a\\n\\nb'"), (std::vector<std::string>{"a", "", "b"}));
+    EXPECT_EQ(LinesOf("true"), std::vector<std::string>{});
+    EXPECT_EQ(LinesOf("printf '%010000d\\nz\\n' 0 | tr 0 x"), (std::vector<std::string>{longer, "z"}));
+
+    CommandOutput partly("seq 1 100000; exit 5");
+    std::string line;
+    EXPECT_TRUE(partly.Next(line));
+    EXPECT_EQ(line, "1");
+    EXPECT_EQ(partly.Status(), 5);
+    EXPECT_FALSE(partly.Next(line));
+    EXPECT_EQ(partly.Status(), 5);
+}
+
+// A daemon has closed its standard descriptors: the pipe must not land on them.
+TEST(CommandOutput, WithoutStandardDescriptors)
+{
+    const pid_t child = ::fork();
+    if (child == 0) {
+        for (int fd = 0; fd <= 2; ++fd)
+            ::close(fd);
+        CommandOutput output("echo x; cat; exit 6");
+        std::string line;
+        const bool read = output.Next(line) && line == "x" && !output.Next(line);
+        ::_exit(read && output.Status() == 6 && RunCommand("exit 7") == 7 ? 0 : 1);
+    }
+    int status = -1;
+    ::waitpid(child, &status, 0);
+    EXPECT_EQ(status, 0);
+}
+
+}  // namespace
