@@ -4,12 +4,6 @@
 namespace tavo {
 namespace {
 
-// Callers take keys and values as C strings, which end at a NUL byte.
-std::string_view UpToNul(std::string_view text)
-{
-    return text.substr(0, text.find('\0'));
-}
-
 // The first token that is not empty and what follows its delimiter; a missing rest has no data.
 struct Token {
     std::string_view text;

@@ -17,6 +17,12 @@ constexpr bool IsWhiteSpace(char byte)
 // Takes white space off both ends, then one pair of double quotes that encloses the rest.
 std::string_view TrimSetting(std::string_view text);
 
+// Callers take texts as C strings, which end at a NUL byte.
+constexpr std::string_view UpToNul(std::string_view text)
+{
+    return text.substr(0, text.find('\0'));
+}
+
 constexpr bool IsCommentLine(std::string_view line)
 {
     return line.starts_with('#') || line.starts_with(';');

@@ -22,25 +22,27 @@ namespace {
     return 0;
 }
 
+enum class Missing { fail, create };
+
 // Rewrites a file by an edit of its whole text. The edit takes the old text and gives the new one, or nothing when the
 // line or key that it is about is not there. 1, 0 with ERR_KEY_NOT_FOUND, -1 with another code.
 template <class Edit>
-int RewriteText(const char *path, Edit &&edit, Line line = Line{__builtin_LINE()})
+int RewriteText(const char *path, Missing missing, Edit &&edit, Line line = Line{__builtin_LINE()})
 {
-    return Guard(
-        [&] {
-            FileRewrite rewrite;
-            std::string text;
-            if (const int code = rewrite.Open(path))
-                return Fail(code, line);
-            if (!rewrite.Read(text))
-                return Fail(ERR_WRITE_FAILED, line);  // the code of everything between open and rename
-            const std::optional<std::string> changed = edit(std::string_view(text));
-            if (!changed)
-                return static_cast<int>(FailZero(ERR_KEY_NOT_FOUND, line));
-            return ReplaceOrFail(rewrite, *changed, line) == 0 ? 1 : -1;
-        },
-        ERR_OUT_OF_MEMORY, line);
+    const auto rewrite_text = [&] {
+        FileRewrite rewrite;
+        std::string text;
+        const int code = rewrite.Open(path);
+        if (code && !(rewrite.IsMissing() && missing == Missing::create))
+            return Fail(code, line);
+        if (!code && !rewrite.Read(text))
+            return Fail(ERR_WRITE_FAILED, line);  // the one code of everything between open and rename
+        const std::optional<std::string> changed = edit(std::string_view(text));
+        if (!changed)
+            return static_cast<int>(FailZero(ERR_KEY_NOT_FOUND, line));
+        return ReplaceOrFail(rewrite, *changed, line) == 0 ? 1 : -1;
+    };
+    return Guard(rewrite_text, ERR_OUT_OF_MEMORY, line);
 }
 
 }  // namespace

@@ -1,0 +1,15 @@
+// Appends to a file in place.
+#ifndef TAVO_CORE_DETAIL_FILE_APPEND_H
+#define TAVO_CORE_DETAIL_FILE_APPEND_H
+
+#include <string>
+
+namespace tavo {
+
+// Appends text in one write and syncs it; `fd` is open for reading and appending. A last line that lacks its newline,
+// as a crash may leave it, gets it first. When it fails, the file is cut back to its old length.
+bool AppendText(int fd, std::string text);
+
+}  // namespace tavo
+
+#endif

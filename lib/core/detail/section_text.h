@@ -1,0 +1,17 @@
+// A section as text: what ErrTLIBIFileHash2File writes.
+#ifndef TAVO_CORE_DETAIL_SECTION_TEXT_H
+#define TAVO_CORE_DETAIL_SECTION_TEXT_H
+
+#include "tavo_hash.h"
+
+#include <optional>
+#include <string>
+
+namespace tavo {
+
+// Empty when it cannot be written; the error state then says why.
+std::optional<std::string> SectionText(const char *name, const TLIBSZHASH *pairs, const char *format);
+
+}  // namespace tavo
+
+#endif

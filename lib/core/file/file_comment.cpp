@@ -1,0 +1,89 @@
+// Turns the lines of a key into comments.
+#include "tavo_file.h"
+
+#include "core/detail/key_value_line.h"
+#include "core/detail/line_reader.h"
+#include "core/detail/rewrite_report.h"
+
+#include <sys/file.h>
+
+namespace {
+
+// What lies in this directory is copied into every new home, so nothing may stay there.
+constexpr const char *kScratch = "/etc/skel/tempErrTLIBFileComment";
+
+std::optional<std::string> WithComments(std::string_view text, std::string_view key)
+{
+    const size_t old_size = text.size();
+    std::string changed;
+    changed.reserve(old_size + 1);
+    while (!text.empty()) {
+        const std::string_view line = tavo::TakeWholeLine(text);
+        if (tavo::LineSetsKey(line, key))
+            changed += ';';
+        changed += line;
+    }
+    if (changed.size() == old_size)
+        return std::nullopt;
+    return changed;
+}
+
+// Locks the scratch file, which says that its process lives, and sees that it is still the one of that name.
+bool Claim(const tavo::Fd &fd)
+{
+    struct stat open_file, named;
+    return ::flock(fd.Get(), LOCK_EX | LOCK_NB) == 0 && ::fstat(fd.Get(), &open_file) == 0 &&
+           ::lstat(kScratch, &named) == 0 && open_file.st_dev == named.st_dev && open_file.st_ino == named.st_ino &&
+           open_file.st_uid == ::geteuid() && open_file.st_nlink == 1;
+}
+
+// Removes what a process that died has left. Anything else of that name is not ours and stays.
+bool RemoveStale()
+{
+    const tavo::Fd fd = tavo::OpenRegular(kScratch, O_RDONLY | O_NOFOLLOW);
+    return fd && Claim(fd) && ::unlink(kScratch) == 0;
+}
+
+tavo::Fd CreateScratch()
+{
+    constexpr int how = O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW;
+    tavo::Fd fd = tavo::OpenFd(kScratch, how, 0600);
+    if (!fd && errno == EEXIST && RemoveStale())
+        fd = tavo::OpenFd(kScratch, how, 0600);
+    if (fd && !Claim(fd))
+        fd.Reset();  // another process took it for stale in that moment, and removes it
+    return fd;
+}
+
+// By the scratch file, else beside the target as every other rewrite.
+bool ReplaceByScratch(tavo::FileRewrite &rewrite, std::string_view text)
+{
+    const tavo::Fd lock = CreateScratch();  // held beyond the rename
+    if (!lock)
+        return false;
+    tavo::TempFile temp;
+    temp.Adopt(tavo::Fd(::fcntl(lock.Get(), F_DUPFD_CLOEXEC, 0)), kScratch);
+    return rewrite.ReplaceBy(temp, text) == 0;
+}
+
+}  // namespace
+
+extern "C" int TLIBFileComment(const char *szPath, const char *szKey)
+{
+    if (!szPath || !szKey)
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        tavo::FileRewrite rewrite;
+        std::string text;
+        if (const int code = rewrite.Open(szPath))
+            return Fail(code);
+        if (!rewrite.Read(text))
+            return Fail(ERR_WRITE_FAILED);
+        const std::optional<std::string> changed = WithComments(text, szKey);
+        if (!changed)
+            return static_cast<int>(FailZero(ERR_KEY_NOT_FOUND));
+        if (ReplaceByScratch(rewrite, *changed))
+            return 1;
+        return tavo::ReplaceOrFail(rewrite, *changed) == 0 ? 1 : -1;
+    });
+}

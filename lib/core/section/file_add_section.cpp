@@ -1,0 +1,24 @@
+// Appends a section in place.
+#include "tavo_section.h"
+
+#include "core/detail/file_append.h"
+#include "core/detail/rewrite_report.h"
+#include "core/detail/section_text.h"
+
+extern "C" int ErrTLIBFileAddSection(const char *szPath, const char *szSection, const TLIBSZHASH *pshPairs,
+                                     const char *szFormat)
+{
+    if (!szPath || !szSection || !pshPairs)
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        const std::optional<std::string> text = tavo::SectionText(szSection, pshPairs, szFormat);
+        if (!text)
+            return Fail(tavoerrno);
+        const tavo::Fd fd = tavo::OpenRegular(szPath, O_RDWR | O_APPEND);
+        if (fd)
+            return tavo::AppendText(fd.Get(), *text) ? 0 : Fail(ERR_WRITE_FAILED);
+        tavo::FileRewrite rewrite;
+        rewrite.Open(szPath);
+        return rewrite.IsMissing() ? tavo::ReplaceOrFail(rewrite, *text) : Fail(ERR_OPEN_FAILED);
+    });
+}
