@@ -1,0 +1,50 @@
+// Scripts the tools that the library runs: what is expected, what they print, how they end. At its end every expected
+// call was made and no other, or the test fails.
+#ifndef TESTS_SUPPORT_SCENARIO_H
+#define TESTS_SUPPORT_SCENARIO_H
+
+#include <filesystem>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace test {
+
+class ScriptedCall {
+  public:
+    explicit ScriptedCall(std::filesystem::path path) : path_(std::move(path)) {}
+
+    ScriptedCall &Prints(std::string_view text);
+    ScriptedCall &PrintsError(std::string_view text);
+    ScriptedCall &Exits(int status);
+    ScriptedCall &DiesOf(int signal);
+    ScriptedCall &Times(int count);
+    ScriptedCall &AnyTimes();                     // never, once or often, at any moment
+    ScriptedCall &Runs(std::string_view script);  // "#!/bin/sh ...": an effect of the tool; gets the call's arguments
+
+  private:
+    std::filesystem::path path_;
+};
+
+class Scenario {
+  public:
+    Scenario();   // empty: any call of a scripted tool fails the test
+    ~Scenario();  // fails the test when something was not called, or not expected
+    Scenario(const Scenario &) = delete;
+    Scenario &operator=(const Scenario &) = delete;
+
+    // The whole argument vector, the tool as the library names it first ("/sbin/mdadm", "pvs").
+    ScriptedCall Expect(const std::vector<std::string> &words);
+    ScriptedCall ExpectAny(const std::string &tool);  // with any arguments
+    void InAnyOrder();
+
+    // The calls so far, one quoted line each ("/sbin/mdadm -E /dev/sda3"), expected or not.
+    static std::vector<std::string> Calls();
+    // What went otherwise than scripted; empty when nothing did. Asking starts anew, so the end does not complain
+    // again.
+    std::string Finish();
+};
+
+}  // namespace test
+
+#endif
