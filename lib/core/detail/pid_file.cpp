@@ -8,7 +8,7 @@
 #include <csignal>
 #include <cstdio>
 
-#include <sys/pidfd.h>
+#include <sys/syscall.h>
 
 namespace tavo {
 namespace {
@@ -90,12 +90,12 @@ PidSignal SignalByPidFile(const char *path, int signal) noexcept
     if (!file || file->pid < 1)
         return PidSignal::no_pid;
     // Held from before the check until the signal is sent. Old kernels and emulators have none; then the pid must do.
-    const Fd process(::pidfd_open(file->pid, 0));
+    const Fd process(static_cast<int>(::syscall(SYS_pidfd_open, file->pid, 0u)));
     if (!process && errno == ESRCH)
         return PidSignal::failed;
     if (!MaySpeakFor(*file))
         return PidSignal::no_pid;
-    if (process && ::pidfd_send_signal(process.Get(), signal, nullptr, 0) == 0)
+    if (process && ::syscall(SYS_pidfd_send_signal, process.Get(), signal, nullptr, 0u) == 0)
         return PidSignal::sent;
     if (process && errno != ENOSYS)
         return PidSignal::failed;

@@ -1,0 +1,32 @@
+// Rings when a child of this process ends, so that one can wait for a child and for a deadline at once.
+//
+// While a bell exists, children keep their status until they are collected. The SIGCHLD handler that rings it stays
+// installed when the bell goes; a process that had its children collected by the kernel has them so again.
+#ifndef TAVO_CORE_DETAIL_CHILD_BELL_H
+#define TAVO_CORE_DETAIL_CHILD_BELL_H
+
+#include <chrono>
+#include <csignal>
+
+namespace tavo {
+
+class ChildBell {
+  public:
+    using Clock = std::chrono::steady_clock;
+
+    ChildBell() noexcept;  // aborts the process when it has no descriptors left
+    ~ChildBell();
+    ChildBell(const ChildBell &) = delete;
+    ChildBell &operator=(const ChildBell &) = delete;
+
+    // True when some child may have ended since the last call; false when the deadline has passed.
+    bool Wait(Clock::time_point deadline) noexcept;
+
+  private:
+    bool kernel_collects_;
+    sigset_t mask_;
+};
+
+}  // namespace tavo
+
+#endif

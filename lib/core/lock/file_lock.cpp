@@ -1,0 +1,125 @@
+// Takes locks: all of a request or none.
+#include "tavo_lock.h"
+
+#include "core/detail/fault.h"
+#include "core/detail/open_file.h"
+
+#include <ctime>
+
+#include <sys/file.h>
+
+namespace {
+
+using tavo::Fd;
+using tavo::File;
+
+constexpr unsigned kModeBits = 0xF;
+constexpr long kRetryNanoseconds = 50'000'000;
+constexpr int kTicksPerSecond = 100;
+constexpr int kTicksPerRetry = 5;
+
+enum class Take { taken, not_opened, busy };
+enum class Attempt { complete, incomplete, hopeless };
+
+bool IsMode(unsigned mode)
+{
+    const unsigned kind = mode & ~static_cast<unsigned>(TAVO_LOCK_NONBLOCKING);
+    return kind == TAVO_LOCK_SHARED || kind == TAVO_LOCK_EXCLUSIVE;
+}
+
+bool IsExclusive(unsigned mode)
+{
+    return (mode & TAVO_LOCK_EXCLUSIVE) != 0;
+}
+
+bool StillNamed(int fd, const char *path)
+{
+    struct stat held, named;
+    return ::fstat(fd, &held) == 0 && ::lstat(path, &named) == 0 && held.st_dev == named.st_dev &&
+           held.st_ino == named.st_ino;
+}
+
+bool Flock(int fd, unsigned mode)
+{
+    int result;
+    do
+        result = ::flock(fd, static_cast<int>(mode));
+    while (result != 0 && errno == EINTR);  // a child that died is no answer about the lock
+    return result == 0;
+}
+
+Take TakeFile(TLIBLOCKFILE &entry, unsigned mode)
+{
+    // A cleaner of /tmp may replace the file between open and flock; then the lock excludes nobody.
+    for (int tries = 0; tries < 10; ++tries) {
+        Fd fd = tavo::OpenRegular(entry.szPath, O_RDONLY | O_NOFOLLOW);
+        if (!fd && (errno != ENOENT || ErrTLIBILockCheckDir() != 0))
+            return Take::not_opened;
+        if (!fd)
+            continue;
+        if (!Flock(fd.Get(), mode))
+            return Take::busy;
+        if (!StillNamed(fd.Get(), entry.szPath))
+            continue;
+        File stream(::fdopen(fd.Get(), "re"));
+        if (!stream)
+            return Take::not_opened;
+        fd.Release();
+        entry.pfLock = stream.Release();
+        entry.nRef = 1;
+        entry.nMode = static_cast<int>(mode);
+        return Take::taken;
+    }
+    return Take::not_opened;
+}
+
+// Hopeless is what waiting cannot help: this process itself holds a shared lock that would have to become exclusive.
+Attempt TakeAll(unsigned wanted, unsigned mode, unsigned &taken)
+{
+    for (TLIBLOCKFILE *entry = rgslckList; entry->fLockBit != 0; ++entry) {
+        if ((entry->fLockBit & wanted) == 0)
+            continue;
+        if (!entry->pfLock) {
+            const Take take = TakeFile(*entry, mode);
+            if (take == Take::busy)
+                return Attempt::incomplete;
+            if (take == Take::not_opened)
+                continue;
+        } else if (IsExclusive(mode) && !IsExclusive(static_cast<unsigned>(entry->nMode))) {
+            return Attempt::hopeless;
+        } else {
+            ++entry->nRef;
+        }
+        taken |= entry->fLockBit;
+    }
+    return taken == wanted ? Attempt::complete : Attempt::incomplete;
+}
+
+void SleepThroughSignals(long nanoseconds)
+{
+    struct timespec left = {0, nanoseconds};
+    while (::nanosleep(&left, &left) != 0 && errno == EINTR) {
+    }
+}
+
+}  // namespace
+
+extern "C" int ErrTLIBFileLock(unsigned int request, int timeout)
+{
+    if (ErrTLIBILockCheckDir() != 0)
+        return -1;
+    const unsigned mode = request & kModeBits;
+    const unsigned wanted = request & ~kModeBits;
+    if (!IsMode(mode))
+        return Fail(ERR_LOCK_FAILED, Line{87});
+    for (long long ticks = static_cast<long long>(timeout) * kTicksPerSecond;; ticks -= kTicksPerRetry) {
+        unsigned taken = 0;
+        const Attempt attempt = TakeAll(wanted, mode, taken);
+        if (attempt == Attempt::complete)
+            return 0;
+        ErrTLIBFileUnlock(taken);
+        if (attempt == Attempt::hopeless || ticks <= 0)
+            return Fail(ERR_LOCK_FAILED, Line{87});
+        SleepThroughSignals(kRetryNanoseconds);
+    }
+}

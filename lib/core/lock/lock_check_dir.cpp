@@ -1,0 +1,71 @@
+// Creates the directory of the lock files and every lock file that is missing.
+//
+// Everybody may create names in /tmp, before the appliance does. Root follows no link there, waits for no FIFO, and takes
+// no lock in a directory in which somebody else could exchange the files.
+#include "tavo_lock.h"
+
+#include "core/detail/fault.h"
+#include "core/detail/owner.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+
+namespace {
+
+using tavo::Fd;
+
+constexpr char kDirectory[] = "/tmp/lock";
+constexpr mode_t kDirectoryMode = 0755;
+constexpr mode_t kFileMode = 0644;  // programs without privileges lock what they read, too
+
+bool IsOwnerTrusted(const struct stat &st)
+{
+    return st.st_uid == 0 || st.st_uid == ::geteuid();
+}
+
+Fd OpenDirectory()
+{
+    Fd fd(::open(kDirectory, O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
+    if (!fd && errno == ENOENT) {
+        const bool created = ::mkdir(kDirectory, 0700) == 0;
+        if (!created && errno != EEXIST)
+            return Fd();
+        fd.Reset(::open(kDirectory, O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
+        if (fd && created && ::fchmod(fd.Get(), kDirectoryMode) != 0)
+            return Fd();
+    }
+    struct stat st;
+    if (!fd || ::fstat(fd.Get(), &st) != 0 || !IsOwnerTrusted(st) || (st.st_mode & (S_IWGRP | S_IWOTH)) != 0)
+        return Fd();
+    return fd;
+}
+
+bool IsLockFile(int directory, const char *name)
+{
+    struct stat st;
+    return ::fstatat(directory, name, &st, AT_SYMLINK_NOFOLLOW) == 0 && S_ISREG(st.st_mode) && IsOwnerTrusted(st);
+}
+
+bool CreateLockFile(int directory, const char *name)
+{
+    const Fd fd(::openat(directory, name, O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC,
+                         kFileMode));
+    if (fd)
+        return ::fchmod(fd.Get(), kFileMode) == 0;  // whatever the umask of the first caller
+    return errno == EEXIST && IsLockFile(directory, name);
+}
+
+}  // namespace
+
+extern "C" int ErrTLIBILockCheckDir(void)
+{
+    const Fd directory = OpenDirectory();
+    if (!directory)
+        return Fail(ERR_CREATE_FAILED, Line{37});
+    for (const TLIBLOCKFILE *entry = rgslckList; entry->fLockBit != 0; ++entry) {
+        const char *const name = entry->szPath + sizeof kDirectory;
+        if (!IsLockFile(directory.Get(), name) && !CreateLockFile(directory.Get(), name))
+            return Fail(ERR_OPEN_FAILED, Line{45});
+    }
+    return 0;
+}

@@ -1,0 +1,136 @@
+// Finds processes by their line in the process table.
+#include "tavo_proc.h"
+
+#include "core/detail/guard.h"
+#include "core/detail/open_file.h"
+#include "core/detail/process_list.h"
+#include "core/detail/run_command.h"
+#include "core/detail/shell_command.h"
+
+#include <charconv>
+#include <string>
+
+namespace {
+
+// The scratch file of the search, gone when it is.
+class ScratchFile {
+  public:
+    explicit ScratchFile(std::string path) : path_(std::move(path))
+    {
+        // One of an earlier process with our pid is in the way; what belongs to somebody else is not ours to remove.
+        struct stat st;
+        if (::lstat(path_.c_str(), &st) == 0 && st.st_uid == ::geteuid() && !S_ISDIR(st.st_mode))
+            ::unlink(path_.c_str());
+        fd_ = tavo::OpenFd(path_.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
+    }
+    ~ScratchFile()
+    {
+        tavo::KeepErrno keep;
+        if (fd_)
+            TLIBSysRemove(path_.c_str());
+    }
+    ScratchFile(const ScratchFile &) = delete;
+    ScratchFile &operator=(const ScratchFile &) = delete;
+
+    explicit operator bool() const { return static_cast<bool>(fd_); }
+    const std::string &Path() const { return path_; }
+
+    // The file as it stands under its name now, if it still is the one that was created.
+    tavo::File Reopen() const
+    {
+        tavo::Fd fd = tavo::OpenRegular(path_.c_str(), O_RDONLY | O_NOFOLLOW);
+        struct stat created, named;
+        if (!fd || ::fstat(fd_.Get(), &created) != 0 || ::fstat(fd.Get(), &named) != 0 ||
+            created.st_ino != named.st_ino)
+            return tavo::File();
+        tavo::File stream(::fdopen(fd.Get(), "re"));
+        if (stream)
+            fd.Release();
+        return stream;
+    }
+
+  private:
+    std::string path_;
+    tavo::Fd fd_;
+};
+
+// What is found, line by line.
+class Search {
+  public:
+    Search(const std::string &pattern, pid_t *pids, int capacity)
+        : plain_("grep " + pattern), quoted_("grep '" + pattern + "'"), pids_(pids), capacity_(capacity)
+    {
+    }
+
+    // A line without a pid (a title, a complaint of grep) is no process.
+    void Add(std::string_view line)
+    {
+        if (line.find(plain_) != std::string_view::npos || line.find(quoted_) != std::string_view::npos) {
+            listed_ = true;
+            return;
+        }
+        line.remove_prefix(std::min(line.find_first_not_of(" \t"), line.size()));
+        pid_t pid = 0;
+        if (std::from_chars(line.data(), line.data() + line.size(), pid).ec != std::errc() || pid < 1)
+            return;
+        listed_ = true;
+        if (count_ < capacity_)
+            pids_[count_] = pid;
+        ++count_;
+    }
+
+    // The search is a process that matches, too: without a single line, nobody has listed processes.
+    bool HasListed() const { return listed_; }
+    int Count() const { return count_; }
+
+  private:
+    std::string plain_;
+    std::string quoted_;
+    pid_t *pids_;
+    int capacity_;
+    int count_ = 0;
+    bool listed_ = false;
+};
+
+void AddLines(std::FILE *stream, Search &search)
+{
+    char *line = nullptr;
+    size_t size = 0;
+    ssize_t length;
+    while ((length = ::getline(&line, &size, stream)) >= 0)
+        search.Add({line, static_cast<size_t>(length)});
+    std::free(line);
+}
+
+int FindByPs(const std::string &pattern, pid_t *pids, int capacity)
+{
+    const ScratchFile scratch("/tmp/tempTLIBPs" + std::to_string(::getpid()));
+    if (!scratch)
+        return Fail(ERR_READ_FAILED);
+    Search search(pattern, pids, capacity);
+    if (const auto command = tavo::ShellCommand("/bin/ps -I | /bin/grep '%s' > %s 2>&1", pattern, scratch.Path()))
+        tavo::RunCommandQuietly(*command);
+    const tavo::File found = scratch.Reopen();
+    if (!found)
+        return Fail(ERR_READ_FAILED);
+    AddLines(found.Get(), search);
+    if (search.HasListed())
+        return search.Count();
+
+    // Most machines' ps does not know -I.
+    for (const tavo::Process &process : tavo::ListProcesses()) {
+        const std::string line = ProcessLine(process);
+        if (line.find(pattern) != std::string::npos)
+            search.Add(line);
+    }
+    return search.Count();
+}
+
+}  // namespace
+
+extern "C" int TLIBPs(const char *szPattern, pid_t *rgPid, int nPid)
+{
+    if (!szPattern || (!rgPid && nPid > 0))
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] { return FindByPs(szPattern, rgPid, nPid); });
+}
