@@ -112,7 +112,7 @@ void LinkTree(const std::string &from, const std::string &to, const std::string 
     struct stat facts;
     Must(::lstat(from.c_str(), &facts) == 0, "look at", from);
     if (S_ISLNK(facts.st_mode)) {
-        Must(::symlink(ReadLink(from).c_str(), to.c_str()) == 0, "link", to);
+        Must(::link(from.c_str(), to.c_str()) == 0 || ::symlink(ReadLink(from).c_str(), to.c_str()) == 0, "link", to);
     } else if (S_ISDIR(facts.st_mode)) {
         Must(::mkdir(to.c_str(), 0755) == 0 || errno == EEXIST, "make", to);
         for (const std::string &name : NamesIn(from)) {
