@@ -58,7 +58,10 @@ END
 
 # Brings the lists up to date. A mirror in the middle of its own update may lack one of them; what is there will do,
 # and a package that cannot be found is reported by name later.
-arm_apt_update() { arm_apt apt-get -qq update >&2 || say "some package lists did not come; going on with the others"; }
+arm_apt_update() {
+    arm_apt apt-get -qq update >"$arm_cache/apt/update.log" 2>&1 ||
+        say "some package lists did not come ($arm_cache/apt/update.log); going on with the others"
+}
 
 # arm_unpack DIRECTORY with|alone NAME...: unpacks packages, with all that they depend on or alone. No maintainer
 # script runs, so no emulator and no root is needed.
@@ -83,6 +86,7 @@ arm_unpack() {
         [[ -e $directory/$part ]] || ln -s "usr/$part" "$directory/$part"
     done
     while read -r archive; do
-        dpkg-deb -x "$arm_cache/apt/archives/$archive" "$directory" || return 1
+        dpkg-deb --fsys-tarfile "$arm_cache/apt/archives/$archive" |
+            tar -x --keep-directory-symlink --no-same-owner -p -C "$directory" || return 1
     done <<<"$files"
 }
