@@ -1,0 +1,376 @@
+"""The virtual appliance: a 32-bit ARM machine in an emulator, started or woken from a saved state.
+
+Nothing of a running machine lies in the file system: its disks are unlinked files, its lines to the host inherited
+sockets, and the emulator dies with the process that started it.
+"""
+import ctypes
+import dataclasses
+import fcntl
+import hashlib
+import json
+import os
+import re
+import selectors
+import shlex
+import shutil
+import signal
+import socket
+import struct
+import subprocess
+import tempfile
+import time
+
+TOOLS = os.path.dirname(os.path.realpath(__file__))
+TREE = os.path.realpath(os.path.join(TOOLS, '../../..'))
+CACHE = os.path.realpath(os.environ.get('TAVO_ARM_CACHE') or os.path.join(TREE, 'build/appliance/arm'))
+
+# What a kernel says when something in it went wrong. A process that ran out of memory is not among it.
+FAULT = re.compile(r'Kernel panic|Oops|BUG:|kernel BUG at|Internal error:|Unable to handle kernel|WARNING: CPU:'
+                   r'|refcount_t:|list_(add|del) corruption|blocked for more than|Bad page state')
+
+
+class Died(Exception):
+    """The machine ended, or stopped answering, in the middle of a job."""
+
+
+class OutOfTime(Exception):
+    """The host's own limit for the whole run has passed."""
+
+
+@dataclasses.dataclass(frozen=True)
+class Hardware:
+    disks: int = 6
+    size: int = 96  # MiB each
+    bus: str = 'sata'
+    memory: int = 512  # MiB
+
+    def __post_init__(self):
+        most = 6 if self.bus == 'sata' else 26
+        if self.bus not in ('sata', 'scsi') or not 0 <= self.disks <= most or self.size < 1 or self.memory < 256:
+            raise ValueError(f'no such machine: {self.disks} disks of {self.size} MiB on {self.bus} '
+                             f'({most} disks at most), {self.memory} MiB of memory (256 at least)')
+
+
+@dataclasses.dataclass
+class Outcome:
+    status: int  # as wait() gives it
+    killed_for_memory: int
+    left_behind: int
+
+    @property
+    def signal(self):
+        return os.WTERMSIG(self.status) if os.WIFSIGNALED(self.status) else 0
+
+    @property
+    def exit_code(self):
+        """As a shell gives it."""
+        return 128 + self.signal if self.signal else os.WEXITSTATUS(self.status)
+
+
+def _die_with_parent():
+    ctypes.CDLL(None).prctl(1, signal.SIGKILL)  # PR_SET_PDEATHSIG
+    os.setpgid(0, 0)  # an interrupt at the terminal is for us, who then end the machine
+
+
+class _Monitor:
+    """Commands to the emulator itself."""
+
+    def __init__(self, line):
+        line.settimeout(60)
+        self.stream = line.makefile('rwb', buffering=0)
+        self.events = []
+        json.loads(self._line())
+        self('qmp_capabilities')
+
+    def _line(self):
+        line = self.stream.readline()
+        if not line:
+            raise Died('the emulator ended')
+        return line
+
+    def __call__(self, command, **arguments):
+        self.stream.write(json.dumps({'execute': command, 'arguments': arguments}).encode() + b'\n')
+        while True:
+            answer = json.loads(self._line())
+            if 'return' in answer:
+                return answer['return']
+            if 'error' in answer:
+                raise RuntimeError(answer['error']['desc'])
+            self.events.append(answer)
+
+    def wait_for(self, event, device):
+        while True:
+            for seen in self.events:
+                if seen['event'] == event and seen['data'].get('device') == device:
+                    self.events.remove(seen)
+                    return
+            self.events.append(json.loads(self._line()))
+
+
+class Machine:
+    """with Machine(...) as machine: outcome = machine.run([...])"""
+
+    def __init__(self, image, hardware=Hardware(), share=None, cold=False, deadline=None):
+        self.image, self.hardware, self.deadline = image, hardware, deadline
+        self.share = os.path.realpath(share) if share else None
+        self.cold = cold
+        self.console = b''
+        self.console_to = None  # where an interactive console goes
+        self.tick = None
+        self.process = None
+        self.lines = {}
+
+    def __enter__(self):
+        try:
+            if self.cold:
+                self._start()
+                self._await_hello()
+            else:
+                self._wake(self._saved_state())
+            self._send(b'S', b'%d\n' % time.time() + os.urandom(32))
+        except BaseException:
+            self.close()
+            raise
+        return self
+
+    def __exit__(self, *_):
+        self.close()
+
+    def close(self):
+        if self.process:
+            self.process.kill()
+            self.process.wait()
+            self.process = None
+        for line in self.lines.values():
+            line.close()
+        self.lines = {}
+
+    # Starting
+
+    def _start(self, memory_file=None, private=True, incoming=False):
+        hardware = self.hardware
+        nothing = os.path.join(CACHE, 'nothing')
+        programs = os.path.join(CACHE, 'programs')
+        for directory in (nothing, programs):
+            os.makedirs(directory, exist_ok=True)
+        inherited = []
+        peers = {}
+
+        def line(name):
+            ours, theirs = socket.socketpair()
+            self.lines[name] = ours
+            peers[name] = theirs
+            inherited.append(theirs.fileno())
+            return f'socket,id={name},fd={theirs.fileno()}'
+
+        memory = f'memory-backend-ram,id=ram,size={hardware.memory}M'
+        if memory_file:
+            memory = (f'memory-backend-file,id=ram,size={hardware.memory}M,mem-path={memory_file},'
+                      f'share={"off" if private else "on"}')
+        command = [
+            'qemu-system-arm', '-nodefaults', '-no-user-config', '-no-reboot', '-display', 'none',
+            '-M', 'virt,memory-backend=ram', '-object', memory, '-m', str(hardware.memory),
+            '-cpu', 'cortex-a15', '-accel', 'tcg', '-smp', '1',
+            '-kernel', f'{self.image}/vmlinuz', '-initrd', f'{self.image}/root.cpio',
+            '-append', 'console=ttyAMA0 loglevel=5 quiet panic=-1 oops=panic rdinit=/init cryptomgr.notests nowatchdog '
+                       f'rcupdate.rcu_cpu_stall_suppress=1 tavo.disks={hardware.disks}',
+            '-chardev', line('console'), '-serial', 'chardev:console',
+            '-chardev', line('monitor'), '-mon', 'chardev=monitor,mode=control',
+            '-device', 'virtio-serial-pci', '-device', 'virtio-rng-pci',
+            '-chardev', line('agent'), '-device', 'virtserialport,chardev=agent,name=agent',
+            '-chardev', line('events'), '-device', 'virtserialport,chardev=events,name=events',
+            '-fsdev', f'local,id=host,path={self.share or nothing},security_model=none',
+            '-device', 'virtio-9p-pci,fsdev=host,mount_tag=host',
+            '-fsdev', f'local,id=programs,path={programs},security_model=none,readonly=on',
+            '-device', 'virtio-9p-pci,fsdev=programs,mount_tag=programs',
+            '-device', 'ich9-ahci,id=bus' if hardware.bus == 'sata' else 'virtio-scsi-pci,id=bus']
+        # Both network cards hang on one cable: what one sends the other hears.
+        for card in range(2):
+            command += ['-netdev', f'hubport,hubid=0,id=cable{card}', '-device',
+                        f'virtio-net-pci,id=eth{card},romfile=,speed=1000,duplex=full,netdev=cable{card},'
+                        f'mac=52:54:00:00:00:0{card + 1}']
+        self.disks = []
+        for bay in range(1, hardware.disks + 1):
+            disk = tempfile.TemporaryFile(prefix='tavo-disk.')
+            disk.truncate(hardware.size << 20)
+            self.disks.append(disk)
+            inherited.append(disk.fileno())
+            command += ['-add-fd', f'fd={disk.fileno()},set={bay}', '-blockdev',
+                        f'driver=raw,node-name=disk{bay},discard=unmap,cache.no-flush=on,file.driver=file,'
+                        f'file.filename=/dev/fdset/{bay},file.locking=off,file.discard=unmap',
+                        '-device', json.dumps(self._bay(bay))]
+        if incoming:
+            command += ['-incoming', 'defer']
+        self.process = subprocess.Popen(command, stdin=subprocess.DEVNULL, stdout=subprocess.DEVNULL,
+                                        stderr=subprocess.PIPE, pass_fds=inherited, preexec_fn=_die_with_parent)
+        for peer in peers.values():
+            peer.close()
+        try:
+            self.monitor = _Monitor(self.lines['monitor'])
+        except (Died, OSError) as problem:
+            raise Died(self._last_words()) from problem
+        self.selector = selectors.DefaultSelector()
+        for name in ('agent', 'console', 'events'):
+            self.lines[name].setblocking(True)
+            self.selector.register(self.lines[name], selectors.EVENT_READ, name)
+        self.received = {'agent': b'', 'events': b''}
+
+    def _bay(self, bay):
+        if self.hardware.bus == 'sata':
+            return {'driver': 'ide-hd', 'id': f'bay{bay}', 'bus': f'bus.{bay - 1}', 'drive': f'disk{bay}',
+                    'model': f'NASLAB-HD-{bay}', 'serial': f'SN{bay:04}', 'ver': 'FW1.0'}
+        return {'driver': 'scsi-hd', 'id': f'bay{bay}', 'bus': 'bus.0', 'drive': f'disk{bay}', 'scsi-id': bay - 1,
+                'lun': 0, 'vendor': 'NASLAB', 'product': f'HD-{bay}', 'ver': '1.0', 'serial': f'SN{bay:04}'}
+
+    def _await_hello(self):
+        while True:
+            kind, _ = self._frame()
+            if kind == b'H':
+                return
+
+    def _saved_state(self):
+        """The folder with a machine of this hardware, saved when it had just become ready; made at the first need."""
+        made_from = repr((os.path.basename(self.image), self.hardware)).encode()
+        with open(__file__, 'rb') as source:
+            key = hashlib.sha256(made_from + source.read()).hexdigest()[:16]
+        folder = os.path.join(CACHE, 'saved', key)
+        os.makedirs(os.path.dirname(folder), exist_ok=True)
+        with open(os.path.join(CACHE, 'saved.lock'), 'w') as lock:
+            fcntl.flock(lock, fcntl.LOCK_EX)
+            if not os.path.isdir(folder):
+                self._save(folder)
+            os.utime(folder)
+        return folder
+
+    def _save(self, folder):
+        kept = sorted((entry for entry in os.scandir(os.path.dirname(folder))), key=lambda e: e.stat().st_mtime)
+        for old in kept[:-3]:  # each takes as much room as the machine has memory
+            shutil.rmtree(old.path)
+        new = folder + '.new'
+        shutil.rmtree(new, ignore_errors=True)
+        os.mkdir(new)
+        self._start(f'{new}/memory', private=False)
+        self._await_hello()
+        self.monitor('stop')
+        self.monitor('migrate-set-capabilities', capabilities=[{'capability': 'x-ignore-shared', 'state': True}])
+        self.monitor('migrate', uri='exec:cat >' + shlex.quote(f'{new}/devices'))
+        while (status := self.monitor('query-migrate')['status']) != 'completed':
+            if status == 'failed':
+                raise Died('the machine could not be saved')
+            time.sleep(0.02)
+        self.monitor('quit')
+        self.process.wait()
+        self.close()
+        os.rename(new, folder)
+
+    def _wake(self, folder):
+        self._start(f'{folder}/memory', incoming=True)
+        self.monitor('migrate-set-capabilities', capabilities=[{'capability': 'x-ignore-shared', 'state': True}])
+        self.monitor('migrate-incoming', uri='exec:cat ' + shlex.quote(f'{folder}/devices'))
+        while self.monitor('query-status')['status'] == 'inmigrate':
+            time.sleep(0.005)
+        self.monitor('cont')
+
+    # Talking to it
+
+    def _send(self, kind, payload):
+        self.lines['agent'].sendall(kind + struct.pack('<I', len(payload)) + payload)
+
+    def _frame(self):
+        """The next frame of the agent; what else comes in meanwhile is taken care of."""
+        while True:
+            buffer = self.received['agent']
+            if len(buffer) >= 5:
+                size = struct.unpack_from('<I', buffer, 1)[0]
+                if len(buffer) >= 5 + size:
+                    self.received['agent'] = buffer[5 + size:]
+                    return buffer[:1], buffer[5:5 + size]
+            self._pump()
+
+    def _pump(self):
+        left = self.deadline - time.monotonic() if self.deadline else 60
+        if left <= 0:
+            raise OutOfTime
+        if self.tick:
+            self.tick()
+        for key, _ in self.selector.select(min(left, 1)):
+            if callable(key.data):
+                key.data()
+                continue
+            try:
+                data = key.fileobj.recv(1 << 20)
+            except ConnectionError:
+                data = b''
+            if not data:
+                raise Died(self._last_words())
+            if key.data == 'console':
+                self.console += data
+                if self.console_to:
+                    self.console_to(data)
+            else:
+                self.received[key.data] += data
+        while b'\n' in self.received['events']:
+            request, self.received['events'] = self.received['events'].split(b'\n', 1)
+            self.lines['events'].sendall(self._answer(request.decode(errors='replace')).encode() + b'\n')
+
+    def end_job(self):
+        """Ends the running job; its run() still returns the outcome."""
+        self._send(b'K', b'')
+
+    def _last_words(self):
+        self.process.wait()
+        lines = self.process.stderr.read().decode(errors='replace').splitlines()
+        return '; '.join(line for line in lines if ' warning: ' not in line) or 'the emulator ended'
+
+    def run(self, arguments, output=None, tick=None, environment=(), **options):
+        """Runs a program; output(stream, bytes) gets what it writes while it runs, stream is 'out' or 'err'.
+
+        tick() is called at least once a second. Options: directory, memory (bytes), fresh (a throw-away copy of the
+        root), layer (a folder in the guest that lies over that copy), terminal ("rows columns": on the console).
+        """
+        self.tick = tick
+        words = [f'env={variable}' for variable in environment]
+        words += [name if value is True else f'{name}={value}' for name, value in options.items() if value]
+        words += ['--', *arguments]
+        self._send(b'R', b''.join(word.encode() + b'\0' for word in words))
+        while True:
+            kind, payload = self._frame()
+            if kind == b'X':
+                fields = dict(field.split('=') for field in payload.decode().split())
+                return Outcome(int(fields['status']), int(fields['killed_for_memory']), int(fields['left_behind']))
+            if output and kind in (b'o', b'e'):
+                output('out' if kind == b'o' else 'err', payload)
+
+    def faults(self):
+        """What the kernel said of faults of its own, with what it said around them; empty when all is well."""
+        lines = self.console.decode(errors='replace').replace('\r', '').split('\n')
+        first = next((number for number, line in enumerate(lines) if FAULT.search(line)), None)
+        return [] if first is None else [line for line in lines[max(0, first - 2):first + 40] if line.strip()]
+
+    # Events from outside
+
+    def _answer(self, request):
+        identity, verb, *words = (request.split() + ['', ''])[:4]
+        words = [word for word in words if word]
+        try:
+            self._happen(verb, *words)
+            return f'{identity} done'
+        except Exception as problem:
+            return f'{identity} failed {problem}'.replace('\n', ' ')
+
+    def _happen(self, verb, what, how=''):
+        if verb in ('cut', 'restore') and what in ('eth0', 'eth1'):
+            self.monitor('set_link', name=what, up=verb == 'restore')
+        elif verb in ('pull', 'plug', 'blank') and what.isdigit() and 1 <= int(what) <= self.hardware.disks:
+            bay, hot = int(what), self.hardware.bus == 'scsi'
+            if verb == 'pull' and hot:
+                self.monitor('device_del', id=f'bay{bay}')
+                self.monitor.wait_for('DEVICE_DELETED', f'bay{bay}')
+            if verb == 'blank' or how == 'blank':
+                disk = self.disks[bay - 1]
+                disk.truncate(0)
+                disk.truncate(self.hardware.size << 20)
+            if verb == 'plug' and hot:
+                self.monitor('device_add', **self._bay(bay))
+        else:
+            raise ValueError(f'no such event: {verb} {what}')
