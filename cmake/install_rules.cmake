@@ -16,3 +16,6 @@ install(FILES ${PROJECT_BINARY_DIR}/tavosdkConfig.cmake ${PROJECT_BINARY_DIR}/ta
 
 configure_file(${PROJECT_SOURCE_DIR}/cmake/tavosdk.pc.in ${PROJECT_BINARY_DIR}/tavosdk.pc @ONLY)
 install(FILES ${PROJECT_BINARY_DIR}/tavosdk.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
+
+# Keeps the cleaner of /tmp away from the lock files.
+install(FILES ${PROJECT_SOURCE_DIR}/cmake/tavosdk-tmpfiles.conf DESTINATION lib/tmpfiles.d RENAME tavosdk.conf)

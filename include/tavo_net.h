@@ -5,8 +5,41 @@
 #define TAVO_NET_H
 
 #include "tavo_error.h"
+#include "tavo_list.h"
 
 TAVO_BEGIN_DECLS
+
+/* Where a card gets its address from. */
+enum { TAVO_NET_DHCP = 0, TAVO_NET_STATIC = 1 };
+
+/* An interface. Addresses are dotted quads, "" where there is none. */
+typedef struct TAVONETCARD {
+    int32_t nMode; /* TAVO_NET_DHCP; anything else is static */
+    char szInterface[20];
+    char szIp[20];
+    char szMask[20];
+    char szBroadcast[20];
+    char szNetwork[20];
+    char szGateway[20]; /* the appliance's default gateway */
+    char szMac[20];
+    int32_t nMtu;  /* bytes */
+    int32_t fLink; /* 1: the cable has something at its other end */
+} TAVONETCARD;
+
+/* How interfaces are joined; the order is that of TAVONETLINKAGGR.nMode. */
+enum { TAVO_NET_AGGR_NONE = 0, TAVO_NET_AGGR_LACP = 1, TAVO_NET_AGGR_ADAPTIVE = 2, TAVO_NET_AGGR_BACKUP = 3 };
+
+#define TAVO_NET_MEMBERS 8
+
+/* A bond: several interfaces that work as one. */
+typedef struct TAVONETLINKAGGR {
+    char szBond[20];       /* "bond0" */
+    int32_t nMode;         /* TAVO_NET_AGGR_NONE: no bond */
+    uint32_t fSlaveOption; /* 0: a dissolved bond gives back all its members; else only the members named here count */
+    int32_t nMember;
+    char rgszMember[TAVO_NET_MEMBERS][20];
+    char szPartner[20]; /* of an 802.3ad bond, the hardware address of the switch; "" for none. Not set, only read */
+} TAVONETLINKAGGR;
 
 /*
  * Validators. Each returns 1 when the text is valid, else 0 with
@@ -55,6 +88,110 @@ TAVO_API int ErrTLIBIpMaskToSubnet(char *szIn, char *szOut);
 /* "10.1.2.3/8" becomes "10.0.0.0/255.0.0.0". The length, 1 to 32 bits, is read in the base that its form says, as C
  * does: "/010" is 8 and "/0x18" is 24. */
 TAVO_API int ErrTLIBSubnetToIpMask(char *szIn, char *szOut);
+
+/*
+ * Interfaces. Names are those of the kernel: 1 to 15 letters, digits and "_.:-". An argument that is none is refused with
+ * ERR_BAD_PARAMETERS before anything is read or run. Settings stand in /etc/sysconfig/network-scripts/ifcfg-NAME and
+ * /etc/sysconfig/network; changes hold the network lock (0x106, waiting at most 5 s; ERR_LOCK_FAILED) from beginning to
+ * end and are made by /sbin/ifconfig, /sbin/route, /sbin/dhcpcd and /etc/rc.network.
+ */
+
+/* Reads the first wired interface, from its file and the kernel (/sys/class/net). Returns 0 (with empty addresses when
+ * it has none), or -1 with *pCard untouched and ERR_BAD_PARAMETERS (NULL) or ERR_FILE_NOT_FOUND (no interface). */
+TAVO_API int TAVONetGetCard1(TAVONETCARD *pCard);
+
+/* Gives the interface pCard->szInterface its address. With DHCP a client that runs is killed, then a new one has 30 s to
+ * get a lease; with a static address szIp and szMask are applied and stored. pPrevious is the record as it was (NULL when
+ * there is none): where the address changes, the dynamic-DNS daemon is told. Then routes that are missing are added: the
+ * connected networks and the stored gateway.
+ * Returns 0; -2 when the interface has its address but its file could not be written; or -1 with the old settings in
+ * force and
+ *   ERR_BAD_PARAMETERS   pCard is NULL, or its interface is no name
+ *   ERR_INVALID_NETNAME  the address or the mask is not valid
+ *   ERR_LOCK_FAILED
+ *   ERR_OP_FAILURE       a command failed, or the old client cannot be killed (30 attempts, one a second) */
+TAVO_API int TAVONetSetCard1(const TAVONETCARD *pCard, const TAVONETCARD *pPrevious);
+
+/* 1 when the file of the interface says BOOTPROTO=dhcp, else 0; a file without the key gets BOOTPROTO=static. Holds the
+ * network lock shared (0x105, at most 5 s); when it cannot be had the answer is 0. */
+TAVO_API int BlTAVOLnxIsDHCP(const char *szInterface);
+
+/* The default gateway: of the kernel (/proc/net/route), and as stored (GATEWAY). It goes to szGateway.
+ * Return 0, or -1 with ERR_BAD_PARAMETERS, ERR_KEY_NOT_FOUND (there is none), ERR_NOT_ENOUGH_MEMORY (the buffer is too
+ * small; 16 bytes always do), ERR_OPEN_FAILED, ERR_FORMAT_ERROR (the kernel's table has an unknown form). */
+TAVO_API int TAVONetDefaultGatewayGet(char *szGateway, int cbGateway);
+TAVO_API int TAVONetDefaultGatewayGetConf(char *szGateway, int cbGateway);
+
+/* Makes szGateway the default gateway and stores it. Returns 0, or -1 with the old gateway in force and stored and
+ * ERR_BAD_PARAMETERS (NULL), ERR_INVALID_NETNAME, ERR_OP_FAILURE (it cannot be reached from any interface) or a code of
+ * the settings files. */
+TAVO_API int TAVONetDefaultGatewaySet(const char *szGateway);
+
+/* The stored host name goes to szName (16 bytes always do). Returns 0, or -1 with ERR_BAD_PARAMETERS, ERR_KEY_NOT_FOUND
+ * (none is stored), ERR_NOT_ENOUGH_MEMORY or ERR_OPEN_FAILED. */
+TAVO_API int TAVOLnxGetHostname(char *szName, int cbName);
+
+/* Stores the host name, rewrites the lines of /etc/hosts that name localhost and the appliance (the administrator's
+ * lines stay), and gives the name to the kernel. Returns 0, or -1 with ERR_BAD_PARAMETERS (NULL), ERR_INVALID_NETNAME,
+ * ERR_LOCK_FAILED, ERR_SYS_UNKNOWN (the kernel refused; the name is stored) or a code of the settings files. */
+TAVO_API int TAVOLnxSetHostname(const char *szName);
+
+/* Pushes the name servers of /etc/resolv.conf onto *ppServers, which may move. Returns how many, or -1 with
+ * ERR_BAD_PARAMETERS, ERR_OPEN_FAILED or ERR_OUT_OF_MEMORY. */
+TAVO_API int TAVONetDNSGet(TLIBSZLIST **ppServers);
+
+/* Replaces /etc/resolv.conf (behind a link, the file that it leads to) by one "nameserver" line for each address, IPv4
+ * or IPv6. Returns 0, or -1 with the old file in place and ERR_BAD_PARAMETERS (NULL), ERR_INVALID_NETNAME (not an
+ * address), ERR_LOCK_FAILED or a code of the settings files. */
+TAVO_API int TAVONetDNSSet(const TLIBSZLIST *pServers);
+
+/* The MTU of an interface in bytes, stored as "NAME_mtu" in /etc/tavoinfo.conf; 1500 when none is. As text to szMtu (16
+ * bytes always do): 0 or -1 with ERR_BAD_PARAMETERS or ERR_NOT_ENOUGH_MEMORY. As a number: the result, or -1 with
+ * ERR_BAD_PARAMETERS or ERR_FORMAT_ERROR (what is stored is no MTU). */
+TAVO_API int TAVOConfGetMTUValue(const char *szInterface, char *szMtu, int cbMtu);
+TAVO_API int TAVOGetMTUSetting(const char *szInterface);
+
+/* Sets the MTU, 68 to 65535 bytes: stored (under the lock of the system settings), in the kernel, or both in this order.
+ * Return 0, or -1 with ERR_BAD_PARAMETERS, ERR_LOCK_FAILED, ERR_OP_FAILURE (ifconfig failed) or a code of the settings
+ * files. */
+TAVO_API int TAVOConfSetMTUValue(const char *szInterface, int mtu);
+TAVO_API int TAVONetSetMTUEth(const char *szInterface, int mtu);
+TAVO_API int TAVONetSetMTUValue(const char *szInterface, int mtu);
+
+/* 1 when another host answers for szAddr (one ping, at most 2 s), 0 when none does or the interface itself has the
+ * address; -1 with ERR_BAD_PARAMETERS, or ERR_OP_FAILURE when /bin/ping cannot be run. */
+TAVO_API int TAVOIIpConflict(const char *szInterface, const char *szAddr);
+
+/* 1 when the cable of the interface has something at its other end, else 0. */
+TAVO_API int BlTLIBIsConnected(const char *szInterface);
+
+/*
+ * Link aggregation.
+ */
+
+/* Pushes the names of the kernel's bonds onto *ppBonds, which may move (/sys/class/net/bonding_masters). Returns how many,
+ * or -1 with ERR_BAD_PARAMETERS or ERR_OUT_OF_MEMORY. */
+TAVO_API int TAVONetLinkAggrEnum(TLIBSZLIST **ppBonds);
+
+/* The same for the member interfaces of a bond; 0 for a bond that is not there. */
+TAVO_API int TAVONetLinkAggrPhyGet(const char *szBond, TLIBSZLIST **ppMembers);
+
+/* Reads a bond from the kernel; one that is not there has the mode TAVO_NET_AGGR_NONE. Returns 0, or -1 with
+ * ERR_BAD_PARAMETERS, or ERR_LINK_AGGR_OPTION when the kernel's bond has a mode that the appliance does not offer. */
+TAVO_API int TAVONetLinkAggrGet(const char *szBond, TAVONETLINKAGGR *pAggr);
+
+/* Adds an interface to the members of a record; one that is there already stays once. Changes the record alone. Returns
+ * 0, or -1 with ERR_BAD_PARAMETERS, ERR_LINK_AGGR_TYPE (no Ethernet interface, or a bond itself) or
+ * ERR_LINK_AGGR_OPTION (TAVO_NET_MEMBERS are in it). */
+TAVO_API int TAVONetLinkAggrOptSlsaveAdd(TAVONETLINKAGGR *pAggr, const char *szInterface);
+
+/* Makes the bond as the record has it, or dissolves it. The network is stopped (/etc/rc.network), the interface files are
+ * written (a member's old file is kept as ifcfg-NAME.saved and comes back when the bond is dissolved; the bond takes over
+ * the first member's address), and the network is started again. Nothing is done when all is as asked. Wherever the
+ * process dies, the files describe a network that starts.
+ * Returns 0, or -1 with ERR_BAD_PARAMETERS, ERR_LOCK_FAILED, ERR_WRITE_FAILED (the saved files are back, the network is
+ * started) or ERR_OP_FAILURE (the network did not start). */
+TAVO_API int TAVONetLinkAggrSet(const TAVONETLINKAGGR *pAggr);
 
 TAVO_END_DECLS
 

@@ -4,13 +4,16 @@
 #ifndef TAVOSDK_H
 #define TAVOSDK_H
 
+#include "tavo_appliance.h"
 #include "tavo_bdb.h"
+#include "tavo_disk.h"
 #include "tavo_error.h"
 #include "tavo_file.h"
 #include "tavo_hash.h"
 #include "tavo_list.h"
 #include "tavo_lock.h"
 #include "tavo_net.h"
+#include "tavo_partition.h"
 #include "tavo_proc.h"
 #include "tavo_section.h"
 #include "tavo_str.h"

@@ -203,9 +203,10 @@ bool StorePair(TLIBSZHASH *hash, int slot, std::string_view key, std::string_vie
     HeapBlock<char> kept;
     // A text that the hash has given up may stand just where the key goes.
     if (Overlap(hash->pszNextStr, key.size() + 1, value.data(), value.size() + 1)) {
-        kept.reset(::strdup(value.data()));
+        kept.reset(static_cast<char *>(std::malloc(value.size() + 1)));
         if (!kept)
             return false;
+        std::memcpy(kept.get(), value.data(), value.size() + 1);
         value = {kept.get(), value.size()};
     }
     hash->slots[slot].pszKey = StoreText(hash, key);

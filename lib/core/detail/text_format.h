@@ -7,6 +7,7 @@
 #include <initializer_list>
 #include <string>
 #include <string_view>
+#include <type_traits>
 
 namespace tavo {
 
@@ -23,6 +24,10 @@ class TextArg {
     TextArg(Number number) noexcept : kind_(Kind::number), signed_(static_cast<long long>(number)), bits_(number)
     {
     }
+
+    template <class Code>
+    requires std::is_enum_v<Code> TextArg(Code code)
+    noexcept : TextArg(static_cast<int>(code)) {}
 
     bool IsText() const noexcept { return kind_ == Kind::text; }
     std::string_view Text() const noexcept { return text_; }

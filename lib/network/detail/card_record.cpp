@@ -1,0 +1,59 @@
+// The record of an interface, read from its file and from the kernel.
+#include "network/detail/card_record.h"
+
+#include "network/detail/interface_file.h"
+#include "network/detail/kernel_interface.h"
+#include "network/detail/net_buffer.h"
+
+#include <charconv>
+#include <cstring>
+
+namespace tavo {
+namespace {
+
+template <size_t Size>
+void Put(char (&field)[Size], std::string_view text)
+{
+    if (!ToBuffer(text, field, Size))
+        field[0] = 0;
+}
+
+int Number(const std::string &text)
+{
+    int value = 0;
+    std::from_chars(text.data(), text.data() + text.size(), value);
+    return value;
+}
+
+void PutAddress(TAVONETCARD &card, const InterfaceAddress &found)
+{
+    const uint32_t network = found.address.Word() & found.mask.Word();
+    Put(card.szIp, found.address.Text());
+    Put(card.szMask, found.mask.Text());
+    Put(card.szNetwork, Ipv4::FromWord(network).Text());
+    Put(card.szBroadcast, Ipv4::FromWord(network | ~found.mask.Word()).Text());
+}
+
+}  // namespace
+
+int ReadCard(int index, TAVONETCARD *card)
+{
+    const auto interfaces = WiredInterfaces();
+    if (index < 0 || static_cast<size_t>(index) >= interfaces.size())
+        return 0;
+    const std::string &interface = interfaces[static_cast<size_t>(index)];
+    std::memset(card, 0, sizeof *card);
+    Put(card->szInterface, interface);
+    card->nMode = ReadSetting(InterfaceFile(interface), "BOOTPROTO") == "dhcp" ? TAVO_NET_DHCP : TAVO_NET_STATIC;
+    Put(card->szGateway, ReadSetting(kNetworkFile, "GATEWAY"));
+    Put(card->szMac, InterfaceAttribute(interface, "address"));
+    card->nMtu = Number(InterfaceAttribute(interface, "mtu"));
+    card->fLink = InterfaceAttribute(interface, "carrier") == "1";
+    const auto found = AddressOf(interface);
+    if (!found)
+        return -1;
+    PutAddress(*card, *found);
+    return 1;
+}
+
+}  // namespace tavo

@@ -1,0 +1,21 @@
+// The DHCP client of an interface: its files, its end and its start.
+#ifndef TAVO_NETWORK_DETAIL_DHCP_CLIENT_H
+#define TAVO_NETWORK_DETAIL_DHCP_CLIENT_H
+
+#include <string>
+
+namespace tavo {
+
+std::string DhcpPidFile(const std::string &interface);
+
+enum class ClientEnd {
+    gone,   // killed, or there was none
+    alive,  // it runs and cannot be killed right now
+};
+
+// One attempt. A pid file that names no process, or somebody else's, names no client.
+ClientEnd KillDhcpClient(const std::string &interface) noexcept;
+
+}  // namespace tavo
+
+#endif

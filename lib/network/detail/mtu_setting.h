@@ -1,0 +1,22 @@
+// The stored MTU of an interface: the key "NAME_mtu" of the system settings.
+#ifndef TAVO_NETWORK_DETAIL_MTU_SETTING_H
+#define TAVO_NETWORK_DETAIL_MTU_SETTING_H
+
+#include <cstdio>
+#include <string_view>
+
+namespace tavo {
+
+inline constexpr const char *kMtuDefault = "1500";
+inline constexpr int kMtuLeast = 68;  // what IPv4 needs to work at all
+inline constexpr int kMtuMost = 65535;
+
+struct MtuKey {
+    char text[32];
+
+    explicit MtuKey(const char *interface) noexcept { std::snprintf(text, sizeof text, "%s_mtu", interface); }
+};
+
+}  // namespace tavo
+
+#endif

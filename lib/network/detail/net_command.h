@@ -1,0 +1,20 @@
+// The commands that change the network, run with arguments that have been validated.
+#ifndef TAVO_NETWORK_DETAIL_NET_COMMAND_H
+#define TAVO_NETWORK_DETAIL_NET_COMMAND_H
+
+#include "core/detail/run_command.h"
+#include "core/detail/shell_command.h"
+
+namespace tavo {
+
+// The exit status; -1 when the command could not be composed or run, or was killed.
+template <class... Args>
+int RunNetCommand(const char *format, const Args &...args)
+{
+    const auto command = ShellCommand(format, args...);
+    return command ? RunCommand(*command) : -1;
+}
+
+}  // namespace tavo
+
+#endif

@@ -1,0 +1,30 @@
+// Stores the MTU of an interface; it takes effect when the interface is next configured.
+#include "tavo_net.h"
+
+#include "tavo_file.h"
+
+#include "core/detail/fault.h"
+#include "core/detail/lock_hold.h"
+#include "core/detail/log.h"
+#include "network/detail/interface_name.h"
+#include "network/detail/mtu_setting.h"
+
+extern "C" int TAVOConfSetMTUValue(const char *szInterface, int mtu)
+{
+    if (!szInterface || mtu < tavo::kMtuLeast || mtu > tavo::kMtuMost)
+        return Fail(ERR_BAD_PARAMETERS);
+    if (!tavo::IsInterfaceName(szInterface)) {
+        LogError("%s:%d interface name is too long");
+        return Fail(ERR_BAD_PARAMETERS);
+    }
+    const tavo::LockHold lock(0x806, 5);
+    if (!lock) {
+        LogError("%s (%d) Failed to lock tavoinfo(%X)", TLIBErrGet());
+        return Fail(ERR_LOCK_FAILED);
+    }
+    char value[16];
+    std::snprintf(value, sizeof value, "%d", mtu);
+    if (TLIBFileSetKeyValue("/etc/tavoinfo.conf", tavo::MtuKey(szInterface).text, value, nullptr) < 0)
+        return Fail(TLIBErrGet());
+    return 0;
+}

@@ -1,0 +1,14 @@
+// Tells the host name that is stored.
+#include "tavo_net.h"
+
+#include "tavo_file.h"
+
+#include "core/detail/fault.h"
+#include "network/detail/interface_file.h"
+
+extern "C" int TAVOLnxGetHostname(char *szName, int cbName)
+{
+    if (!szName || cbName <= 0)
+        return Fail(ERR_BAD_PARAMETERS);
+    return TLIBFileGetKeyValue(tavo::kNetworkFile, "HOSTNAME", szName, cbName, 0) > 0 ? 0 : -1;
+}

@@ -1,0 +1,63 @@
+// Stores the name servers.
+#include "tavo_net.h"
+
+#include "core/detail/file_rewrite.h"
+#include "core/detail/guard.h"
+#include "core/detail/lock_hold.h"
+#include "core/detail/log.h"
+#include "network/detail/network_lock.h"
+
+#include <cstring>
+#include <string>
+
+#include <arpa/inet.h>
+
+namespace {
+
+constexpr const char *kResolver = "/etc/resolv.conf";
+
+bool IsServer(const char *text)
+{
+    in6_addr address;
+    return BlTLIBIsIpAddr(text) || ::inet_pton(AF_INET6, text, &address) == 1;
+}
+
+// The log tells which step failed; the old file stands whichever it was.
+void LogFailure(int code)
+{
+    if (code == ERR_RENAME_FAILED)
+        LogError("%s (%d) rename(%s, %s) failed.(%s)", "/etc/resolv.conf.tmp", kResolver, std::strerror(errno));
+    else if (code == ERR_WRITE_FAILED)
+        LogError("%s (%d) fflush failed.(%s)", std::strerror(errno));
+}
+
+}  // namespace
+
+extern "C" int TAVONetDNSSet(const TLIBSZLIST *pServers)
+{
+    if (!pServers)
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        std::string text;
+        for (int i = 0; i < pServers->nItem; ++i) {
+            const char *server = SzTLIBSzListGet(pServers, i);
+            if (!IsServer(server)) {
+                LogError("%s (%d) Bad DNS %s", server);
+                return Fail(ERR_INVALID_NETNAME);
+            }
+            text.append("nameserver\t").append(server).append("\n");
+        }
+        const tavo::LockHold lock(tavo::kNetworkExclusive, tavo::kNetworkSeconds);
+        if (!lock)
+            return Fail(ERR_LOCK_FAILED);
+        tavo::FileRewrite rewrite;
+        int code = rewrite.Open(kResolver);
+        if (code == 0 || rewrite.IsMissing())
+            code = rewrite.Replace(text, 0644);
+        if (code != 0) {
+            LogFailure(code);
+            return Fail(code);
+        }
+        return 0;
+    });
+}

@@ -1,0 +1,121 @@
+// The lines of settings files: which key a line sets, to what, and what may be written.
+#include "core/detail/key_value_line.h"
+#include "core/detail/line_format.h"
+
+#include <gtest/gtest.h>
+
+using namespace std::string_view_literals;
+
+namespace {
+
+TEST(KeyValueLine, SetsItsKeyToItsValue)
+{
+    struct Row {
+        std::string_view line;
+        std::string_view key;  // empty: sets none
+        std::string_view value;
+    };
+    constexpr Row rows[] = {
+        {"runsamba=yes\n", "runsamba", "yes"},
+        {"runsamba=yes", "runsamba", "yes"},
+        {"key = \"a b\" \n", "key", "a b"},
+        {"\t key\t=\r\n", "key", ""},
+        {"key==v\n", "key", "=v"},
+        {"key=a=b\n", "key", "a=b"},
+        {"=x\n", "x", ""},
+        {"==x=y\n", "x", "y"},
+        {"\"key\"=v\n", "key", "v"},
+        {"key=\"\n", "key", "\""},
+        {"key=\"\"\n", "key", ""},
+        {"key=\" v \"\n", "key", " v "},
+        {"key=\"\"v\"\"\n", "key", "\"v\""},
+        {"key='v'\n", "key", "'v'"},
+        {"key=v\0w\n"sv, "key", "v"},
+        {"two words=v\n", "two words", "v"},
+        {" #key=v\n", "#key", "v"},
+        {"[a=b]\n", "[a", "b]"},
+        {"#key=v\n", "", ""},
+        {";key=v\n", "", ""},
+        {"key\n", "", ""},
+        {"\n", "", ""},
+        {"", "", ""},
+        {"=\n", "", ""},
+        {"  =v\n", "", ""},
+        {"ke\0y=v\n"sv, "ke\0y"sv, "v"},
+    };
+    for (const Row &row : rows) {
+        EXPECT_EQ(tavo::LineKey(row.line), row.key) << row.line;
+        if (row.key.empty())
+            continue;
+        EXPECT_TRUE(tavo::LineSetsKey(row.line, row.key)) << row.line;
+        EXPECT_EQ(tavo::LineValue(row.line), row.value) << row.line;
+    }
+}
+
+TEST(KeyValueLine, SetsNoOtherKey)
+{
+    for (const std::string_view key : {"", "KEY", "ke", "keyy", " key", "v", "key=v"})
+        EXPECT_FALSE(tavo::LineSetsKey("key=v\n", key)) << key;
+    EXPECT_TRUE(tavo::LineSetsKey("\"\"q\"\"=v\n", "\"q\"")) << "only one pair of quotes is taken off";
+}
+
+TEST(KeyValueLine, SplitsAtAnySeparator)
+{
+    struct Row {
+        std::string_view line, separators, key, value;  // no key: skipped
+    };
+    constexpr Row rows[] = {
+        {"nameserver 10.0.0.1\n", " \t", "nameserver", "10.0.0.1"},
+        {"  search  a.example b.example\n", " \t", "search", "a.example b.example"},
+        {"a = b = c\n", "=", "a", "b = c"},
+        {"a:b=c\n", ":=", "a", "b=c"},
+        {"a= \n", "=", "a", ""},
+        {"a=\n", "=", "", ""},
+        {"a\n", "=", "", ""},
+        {" =b\n", "=", "", ""},
+        {"#a=b\n", "=", "", ""},
+        {"", "=", "", ""},
+    };
+    for (const Row &row : rows) {
+        const auto pair = tavo::SplitLine(row.line, row.separators);
+        ASSERT_EQ(pair.has_value(), !row.key.empty()) << row.line;
+        if (pair) {
+            EXPECT_EQ(pair->key, row.key) << row.line;
+            EXPECT_EQ(pair->value, row.value) << row.line;
+        }
+    }
+}
+
+TEST(KeyValueLine, RefusesWhatWouldNotBeFoundAgain)
+{
+    for (const std::string_view key : {"", " k", "k\t", "k=", "#k", ";k", "[k", "k\nx", "k\r", "\"k\""})
+        EXPECT_FALSE(tavo::IsWritableKey(key)) << key;
+    for (const std::string_view key : {"k", "two words", "k#", "k]", "\"k", "\xC3\xA4", "%s"})
+        EXPECT_TRUE(tavo::IsWritableKey(key)) << key;
+    EXPECT_FALSE(tavo::IsWritableValue("a\nrunssh=yes"));
+    EXPECT_FALSE(tavo::IsWritableValue("a\r"));
+    EXPECT_TRUE(tavo::IsWritableValue("a=b # \"c\""));
+}
+
+TEST(LineFormat, TakesTwoTextsAndNothingElse)
+{
+    struct Row {
+        const char *format;
+        const char *line;  // NULL: refused
+    };
+    constexpr Row rows[] = {
+        {nullptr, "k=50%d\n"},        {"%s=\"%s\"\n", "k=\"50%d\"\n"},
+        {"%%%s%%=%s%%", "%k%=50%d%"}, {"%s%s", "k50%d"},
+        {"%s=\n", nullptr},           {"", nullptr},
+        {"%s=%s=%s\n", nullptr},      {"%s=%d\n", nullptr},
+        {"%n%s=%s\n", nullptr},       {"%s=%s%n", nullptr},
+        {"%1$s=%2$s\n", nullptr},     {"%s=%5s\n", nullptr},
+        {"%s=%s%", nullptr},          {"%s=%ls\n", nullptr},
+    };
+    for (const Row &row : rows) {
+        const auto line = tavo::FormatLine(row.format, "k", "50%d");
+        EXPECT_EQ(line, row.line ? std::optional<std::string>(row.line) : std::nullopt) << row.format;
+    }
+}
+
+}  // namespace

@@ -1,0 +1,142 @@
+// Many keys of a settings file at once.
+#include "tavo_file.h"
+
+#include "support/captured_log.h"
+#include "support/fault_state.h"
+#include "support/scratch_dir.h"
+#include "support/string_hash.h"
+
+#include <gmock/gmock.h>
+
+#include <memory>
+
+using test::Fault;
+using test::LastFault;
+using test::Pairs;
+using test::StringHash;
+using testing::ElementsAre;
+
+namespace {
+
+using ListPointer = std::unique_ptr<TLIBSZLIST, decltype(&TLIBSzListFree)>;
+
+ListPointer ListOf(std::initializer_list<const char *> items)
+{
+    TLIBSZLIST *list = PslTLIBSzListAlloc(512);
+    for (const char *item : items)
+        TLIBSzListPush(&list, item);
+    return {list, TLIBSzListFree};
+}
+
+class KeysTest : public testing::Test {
+  protected:
+    KeysTest() { test::ForgetFault(); }
+
+    const test::ScratchDir dir_;
+    const std::string file_ = dir_ / "settings.conf";
+    test::CapturedLog log_;
+};
+
+constexpr const char *kText = "a=1\n#a=0\nb = \"two words\"\nno sign\nempty=\na=3\n=c=4\n\"d\"=5\n";
+
+TEST_F(KeysTest, WithoutAWishTheLastOfEachKeyCounts)
+{
+    test::WriteFile(file_, kText);
+    StringHash hash(Pairs{{"kept", "yes"}});
+    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), nullptr, hash.Addr(), "="), 5);
+    EXPECT_EQ(hash.All(), (Pairs{{"kept", "yes"}, {"a", "3"}, {"b", "two words"}, {"c", "4"}, {"d", "5"}}));
+    StringHash same;
+    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), ListOf({}).get(), same.Addr(), "="), 4);
+}
+
+TEST_F(KeysTest, WantedKeysCountTheirFirstLine)
+{
+    test::WriteFile(file_, kText);
+    StringHash hash;
+    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), ListOf({"d", "a", "a", "absent", "empty"}).get(), hash.Addr(), "="), 2);
+    EXPECT_EQ(hash.All(), (Pairs{{"a", "1"}, {"d", "5"}}));
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+}
+
+TEST_F(KeysTest, SplitsAtOtherSeparators)
+{
+    test::WriteFile(file_, "nameserver 10.0.0.1\nnameserver\t10.0.0.2\nsearch  a.example b.example\n");
+    StringHash hash;
+    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), nullptr, hash.Addr(), " \t"), 2);
+    EXPECT_EQ(hash.All(), (Pairs{{"nameserver", "10.0.0.2"}, {"search", "a.example b.example"}}));
+}
+
+TEST_F(KeysTest, GetRefuses)
+{
+    StringHash hash;
+    TLIBSZHASH *none = nullptr;
+    test::WriteFile(file_, kText);
+    for (const int result :
+         {TLIBFileGetKeys(nullptr, nullptr, hash.Addr(), "="), TLIBFileGetKeys(file_.c_str(), nullptr, nullptr, "="),
+          TLIBFileGetKeys(file_.c_str(), nullptr, &none, "="),
+          TLIBFileGetKeys(file_.c_str(), nullptr, hash.Addr(), nullptr)})
+        EXPECT_EQ(result, -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_get_keys"}));
+    EXPECT_EQ(TLIBFileGetKeys((dir_ / "missing").c_str(), nullptr, hash.Addr(), "="), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "file_get_keys"}));
+    EXPECT_EQ(hash.All(), Pairs{});
+}
+
+TEST_F(KeysTest, SetsEveryPairInOneRewrite)
+{
+    test::WriteFile(file_, "# head\nb=1\na=1\nother=x\nb=2\nlast=1");
+    const Pairs pairs{{"a", "A"}, {"b", "B"}, {"new", "N"}};
+    StringHash hash(pairs);
+    EXPECT_EQ(TLIBFileSetKeys(file_.c_str(), hash.Get(), nullptr), 1);
+    EXPECT_EQ(test::ReadFile(file_), "# head\nb=B\na=A\nother=x\nlast=1\nnew=N\n");
+    EXPECT_EQ(hash.All(), pairs) << "the caller's hash is not used up";
+    EXPECT_EQ(TLIBFileSetKeys((dir_ / "made").c_str(), hash.Get(), "%s: %s\n"), 1);
+    StringHash read;
+    EXPECT_EQ(TLIBFileGetKeys((dir_ / "made").c_str(), nullptr, read.Addr(), ":"), 3);
+    EXPECT_EQ(read.All(), pairs);
+    EXPECT_THAT(dir_.Names(), ElementsAre("made", "settings.conf"));
+}
+
+TEST_F(KeysTest, SetsManyKeysOfAnyOrder)
+{
+    Pairs pairs;
+    std::string text, expected;
+    for (int i = 0; i < 300; ++i) {
+        const std::string key = "key" + std::to_string(i);
+        pairs[key] = "new" + std::to_string(i);
+        text += key + "=old\n";
+        expected += key + "=" + pairs[key] + "\n";
+    }
+    test::WriteFile(file_, text);
+    StringHash hash(pairs);
+    EXPECT_EQ(TLIBFileSetKeys(file_.c_str(), hash.Get(), nullptr), 1);
+    EXPECT_EQ(test::ReadFile(file_), expected);
+}
+
+TEST_F(KeysTest, SetRefusesAndLogsTheLine)
+{
+    struct Row {
+        Pairs pairs;
+        const char *format;
+        const char *logged;
+    };
+    const Row rows[] = {
+        {{{"a", "1"}}, "%s\n", "TLIBILineKeyMoveHash2File() failed! szBuf=a, szFormat=%s\\x0A"},
+        {{{"a", "1\n"}}, nullptr, "TLIBILineKeyMoveHash2File() failed! szBuf=a, szFormat=%s=%s\\x0A"},
+        {{{"#a", "1"}}, nullptr, "TLIBILineKeyMoveHash2File() failed! szBuf=#a, szFormat=%s=%s\\x0A"},
+    };
+    test::WriteFile(file_, "a=0\n");
+    for (const Row &row : rows) {
+        log_.Clear();
+        StringHash hash(row.pairs);
+        EXPECT_EQ(TLIBFileSetKeys(file_.c_str(), hash.Get(), row.format), -1);
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_set_keys"}));
+        ASSERT_EQ(log_.Texts().size(), 1u);
+        EXPECT_THAT(log_.Texts()[0], testing::MatchesRegex("file_set_keys:[0-9]+ .*"));
+        EXPECT_THAT(log_.Texts()[0], testing::EndsWith(row.logged));
+    }
+    EXPECT_EQ(TLIBFileSetKeys(file_.c_str(), nullptr, nullptr), -1);
+    EXPECT_EQ(test::ReadFile(file_), "a=0\n");
+}
+
+}  // namespace

@@ -1,0 +1,340 @@
+// Hashes: what each function gives, refuses, and leaves behind.
+#include "tavo_hash.h"
+
+#include "support/container_text.h"
+#include "support/fault_state.h"
+
+#include <gmock/gmock.h>
+
+#include <climits>
+
+using test::Fault;
+using test::Hash;
+using test::LastFault;
+using test::Moving;
+using test::Pairs;
+using testing::ElementsAre;
+using testing::IsEmpty;
+using PairMap = std::map<std::string, std::string>;
+
+namespace {
+
+int SetValue(Hash &hash, const std::string &key, const std::string &value)
+{
+    return Moving(hash, [&](auto **addr) { return TLIBSzHashSetValue(addr, key.c_str(), value.c_str()); });
+}
+
+PairMap Numbered(int count)
+{
+    PairMap pairs;
+    for (int i = 0; i < count; ++i)
+        pairs["key number " + std::to_string(i)] = std::to_string(i * i);
+    return pairs;
+}
+
+Hash MakeHash(const PairMap &pairs)
+{
+    Hash hash(PshTLIBSzHashAlloc(512));
+    for (const auto &[key, value] : pairs)
+        EXPECT_GE(SetValue(hash, key, value), 0) << key;
+    return hash;
+}
+
+TEST(HashCode, SumsLittleEndianWords)
+{
+    const struct {
+        const char *key;
+        int slots;
+        int code;
+    } rows[] = {
+        {"", 31, 0},
+        {"a", 31, 'a' % 31},
+        {"ab", 1000003, 0x6261 % 1000003},
+        {"abcd", INT_MAX, 0x64636261},
+        {"abcde", 119, static_cast<int>((0x64636261U + 0x65U) % 119)},
+        {"abcdefg", 471, static_cast<int>((0x64636261U + 0x676665U) % 471)},
+        {"\xff\xff\xff\xff\xff\xff\xff\xff", 1879,
+         static_cast<int>(0xfffffffeU % 1879)},  // wraps around, stays unsigned
+        {"abcdwxyz", 7511, TLIBIRadixHashCode("wxyzabcd", 7511)},
+        {nullptr, 31, -1},
+        {"a", 0, -1},
+    };
+    for (const auto &row : rows)
+        EXPECT_EQ(TLIBIRadixHashCode(row.key, row.slots), row.code) << (row.key ? row.key : "NULL");
+}
+
+TEST(HashSetValue, GrowsWithTheKeys)
+{
+    const struct {
+        int keys;
+        int slots;
+    } rows[] = {{24, 31}, {25, 119}, {90, 119}, {91, 471}, {354, 471}, {355, 1879}, {1411, 7511}};
+    for (const auto &row : rows) {
+        const PairMap pairs = Numbered(row.keys);
+        const Hash hash = MakeHash(pairs);
+        EXPECT_EQ(hash->nSlot, row.slots) << row.keys;
+        EXPECT_EQ(TLIBSzHashPairNum(hash.get()), row.keys);
+        EXPECT_EQ(Pairs(hash.get()), pairs);
+        for (const auto &[key, value] : pairs)
+            ASSERT_STREQ(SzTLIBSzHashGetValue(hash.get(), key.c_str()), value.c_str());
+    }
+}
+
+// average * free slots + old size + need: what a rebuild gives the strings.
+TEST(HashSetValue, GrowsItsStringAreaByRule)
+{
+    Hash hash(PshTLIBSzHashAlloc(0));
+    EXPECT_EQ(SetValue(hash, "k", "v"), 'k' % 31);
+    EXPECT_EQ(hash->nStrSize, 4 * 31 + 0 + 4);
+    EXPECT_EQ(hash->nStrFree, 4 * 31);
+
+    const std::string just_fits(124 - 3, 'x');
+    EXPECT_GE(SetValue(hash, "l", just_fits), 0);
+    EXPECT_EQ(hash->nStrSize, 128 + 128 * 30 + 124) << "what takes the last byte grows the area too";
+    EXPECT_EQ(hash->nStrFree, hash->nStrSize - 4 - 124);
+
+    EXPECT_GE(SetValue(hash, "l", "short"), 0);
+    EXPECT_EQ(hash->nStrFree, hash->nStrSize - 4 - 124) << "in place";
+    EXPECT_GE(SetValue(hash, "k", "longer"), 0);
+    EXPECT_EQ(hash->nStrFree, hash->nStrSize - 4 - 124 - 7);
+    EXPECT_EQ(Pairs(hash.get()), (PairMap{{"k", "longer"}, {"l", "short"}}));
+}
+
+// One value that keeps growing makes the area grow thirtyfold each time: it has to end in a refusal, not in an
+// overflow.
+TEST(HashSetValue, RefusesBeforeTheCountersOverflow)
+{
+    Hash hash(PshTLIBSzHashAlloc(1 << 26));
+    EXPECT_GE(SetValue(hash, "k", "v"), 0);
+    const std::string large(1 << 26, 'x');
+    test::ForgetFault();
+    EXPECT_EQ(SetValue(hash, "k", large), -1);
+    EXPECT_EQ(SetValue(hash, "other", large), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    EXPECT_EQ(Pairs(hash.get()), (PairMap{{"k", "v"}}));
+    EXPECT_EQ(hash->nStrSize, 1 << 26);
+}
+
+// Keys that all begin at one slot: the writing look-up offers removed pairs behind the home slot only.
+TEST(HashLookDict, WritingPrefersARemovedPairBehindHome)
+{
+    Hash hash(PshTLIBSzHashAlloc(512));
+    const auto key = [](int i) {
+        return std::string(1, static_cast<char>(1 + 31 * i));
+    };  // "\x01", " ", "?", ...
+    EXPECT_EQ(TLIBISetLookDict(hash.get(), key(0).c_str()), 1);
+    EXPECT_EQ(SetValue(hash, key(0), "0"), 1);
+    EXPECT_EQ(TLIBISetLookDict(hash.get(), key(0).c_str()), 1);
+    EXPECT_EQ(TLIBISetLookDict(hash.get(), key(1).c_str()), -1) << "an unused slot behind home is not offered";
+    EXPECT_EQ(SetValue(hash, key(1), "1"), 2);
+    EXPECT_EQ(SetValue(hash, key(2), "2"), 3);
+    EXPECT_EQ(TLIBIGetLookDict(hash.get(), key(2).c_str()), 3);
+    EXPECT_EQ(TLIBIGetLookDict(hash.get(), key(3).c_str()), -1);
+
+    EXPECT_STREQ(SzTLIBSzHashRemoveKey(hash.get(), key(1).c_str()), "1");
+    EXPECT_EQ(TLIBISetLookDict(hash.get(), key(3).c_str()), 2);
+    EXPECT_EQ(TLIBISetLookDict(hash.get(), key(2).c_str()), 3) << "the key itself comes before a removed pair";
+    EXPECT_EQ(TLIBIGetLookDict(hash.get(), key(2).c_str()), 3) << "reading passes over a removed pair";
+    EXPECT_EQ(SetValue(hash, key(3), "3"), 2);
+
+    EXPECT_STREQ(SzTLIBSzHashRemoveKey(hash.get(), key(0).c_str()), "0");
+    EXPECT_EQ(TLIBISetLookDict(hash.get(), key(4).c_str()), -1) << "a removed pair at home is not offered";
+    EXPECT_EQ(SetValue(hash, key(4), "4"), 1) << "but setting a value takes it";
+    EXPECT_EQ(Pairs(hash.get()), (PairMap{{key(2), "2"}, {key(3), "3"}, {key(4), "4"}}));
+}
+
+TEST(HashRemove, KeepsTheTextAndEveryOtherKey)
+{
+    PairMap pairs = Numbered(300);
+    const Hash hash = MakeHash(pairs);
+    const int free = hash->nStrFree;
+    for (int i = 0; i < 300; i += 3) {
+        const std::string key = "key number " + std::to_string(i);
+        EXPECT_EQ(SzTLIBSzHashRemoveKey(hash.get(), key.c_str()), pairs[key]);
+        EXPECT_EQ(SzTLIBSzHashRemoveKey(hash.get(), key.c_str()), nullptr);
+        EXPECT_EQ(SzTLIBSzHashGetValue(hash.get(), key.c_str()), nullptr);
+        pairs.erase(key);
+    }
+    EXPECT_EQ(Pairs(hash.get()), pairs);
+    EXPECT_EQ(TLIBSzHashGetLength(hash.get()), 200);
+    EXPECT_EQ(hash->nStrFree, free);
+}
+
+TEST(HashRemoveAll, TakesEveryKeyAgain)
+{
+    const PairMap pairs = Numbered(24);
+    Hash hash = MakeHash(pairs);
+    const std::string first = pairs.begin()->first;
+    const char *stale = SzTLIBSzHashGetValue(hash.get(), first.c_str());
+    const TLIBSZHASH *block = hash.get();
+    PslSzHashRemoveAll(hash.get());
+    EXPECT_EQ(TLIBSzHashGetLength(hash.get()), 0);
+    EXPECT_EQ(hash->nStrFree, hash->nStrSize);
+    EXPECT_EQ(TLIBSzHashEnumKey(hash.get(), nullptr), 0);
+    EXPECT_EQ(SzTLIBSzHashGetValue(hash.get(), first.c_str()), nullptr);
+
+    // The value stands where the new key goes.
+    const std::string value = stale;
+    EXPECT_GE(Moving(hash, [&](auto **addr) { return TLIBSzHashSetValue(addr, "a rather long key for this", stale); }),
+              0);
+    EXPECT_STREQ(SzTLIBSzHashGetValue(hash.get(), "a rather long key for this"), value.c_str());
+    SzTLIBSzHashRemoveKey(hash.get(), "a rather long key for this");
+
+    for (const auto &[key, text] : pairs)
+        EXPECT_GE(SetValue(hash, key, text), 0) << key;
+    EXPECT_EQ(Pairs(hash.get()), pairs);
+    EXPECT_EQ(hash.get(), block) << "the table has the same number of keys and did not grow";
+}
+
+// Keys and values that the hash handed out may go back in, also when it moves meanwhile.
+TEST(HashSetValue, TakesItsOwnStrings)
+{
+    Hash hash = MakeHash({{"k0", "value 0"}});
+    for (int i = 0; i < 400; ++i) {
+        const char *own = SzTLIBSzHashGetValue(hash.get(), ("k" + std::to_string(i)).c_str());
+        const std::string text = own;
+        const std::string key = "k" + std::to_string(i + 1);
+        ASSERT_GE(Moving(hash, [&](auto **addr) { return TLIBSzHashSetValue(addr, key.c_str(), own); }), 0);
+        ASSERT_EQ(SzTLIBSzHashGetValue(hash.get(), key.c_str()), text);
+        ASSERT_GE(Moving(hash,
+                         [&](auto **addr) {
+                             return TLIBSzHashSetValue(addr, SzTLIBSzHashGetValue(*addr, key.c_str()), key.c_str());
+                         }),
+                  0);
+        ASSERT_EQ(SzTLIBSzHashGetValue(hash.get(), text.c_str()), key);
+    }
+    SetValue(hash, "tail", "abcdef");
+    char *tail = SzTLIBSzHashGetValue(hash.get(), "tail");
+    EXPECT_GE(Moving(hash, [&](auto **addr) { return TLIBSzHashSetValue(addr, "tail", tail + 2); }), 0);
+    EXPECT_STREQ(SzTLIBSzHashGetValue(hash.get(), "tail"), "cdef");
+}
+
+TEST(HashEnumKey, ListsInSlotOrder)
+{
+    const Hash hash = MakeHash({{"c", "3"}, {"a", "1"}, {"B", "2"}, {"", "0"}});
+    test::List list = test::MakeList({"first"});
+    EXPECT_EQ(Moving(list, [&](auto **addr) { return TLIBSzHashEnumKey(hash.get(), addr); }), 4);
+    EXPECT_THAT(test::Items(list.get()), ElementsAre("first", "", "B", "a", "c"));
+    EXPECT_EQ(TLIBSzHashEnumKey(hash.get(), nullptr), 4);
+}
+
+// The steps that callers may put together themselves.
+TEST(HashSteps, WorkAlone)
+{
+    const PairMap pairs = Numbered(20);
+    Hash hash = MakeHash(pairs);
+    SzTLIBSzHashRemoveKey(hash.get(), "key number 7");
+    PairMap left = pairs;
+    left.erase("key number 7");
+
+    Hash copy(PshTLIBIHashAllocator(40, 1000));
+    EXPECT_EQ(TLIBICopyHash(copy.get(), hash.get()), 0);
+    EXPECT_EQ(Pairs(copy.get()), left);
+    EXPECT_EQ(TLIBICopyHash(copy.get(), hash.get()), -1) << "the keys are there already";
+    const Hash small(PshTLIBIHashAllocator(40, 30));
+    EXPECT_EQ(TLIBICopyHash(small.get(), hash.get()), -1);
+
+    EXPECT_EQ(PshTLIBIReSizeHash(hash.get(), 18, 1000), nullptr);
+    EXPECT_EQ(PshTLIBIReSizeHash(hash.get(), 40, 100), nullptr);
+    EXPECT_EQ(PshTLIBIReSizeHash(hash.get(), INT_MAX, INT_MAX), nullptr);
+    EXPECT_EQ(Pairs(hash.get()), left);
+    hash.reset(PshTLIBIReSizeHash(hash.release(), 19, 1000));
+    ASSERT_TRUE(hash);
+    EXPECT_EQ(Pairs(hash.get()), left);
+    EXPECT_EQ(hash->nStrSize, 1000);
+
+    // A table without a free slot grows when a key is set.
+    EXPECT_GE(SetValue(hash, "one more", "x"), 0);
+    left["one more"] = "x";
+    EXPECT_EQ(hash->nSlot, 4 * 19 - 5);
+    EXPECT_EQ(Pairs(hash.get()), left);
+
+    EXPECT_EQ(PshTLIBICheckSpace(hash.get(), 10), hash.get());
+    int slot = -1;
+    TLIBSZHASH *block = hash.release();
+    EXPECT_EQ(PshTLIBIInsertNewPair(block, &slot, "one more", "y"), nullptr);
+    EXPECT_EQ(PshTLIBIInsertNewPair(block, &slot, "and another", "z"), block);
+    EXPECT_STREQ(block->slots[slot].pszValue, "z");
+    EXPECT_EQ(TLIBIInsertPair(block, slot, "k", "v"), -1) << "the slot is taken";
+    const int other = slot;
+    slot = TLIBIGetLookDict(block, "one more");
+    EXPECT_EQ(PshTLIBIUpdateValue(block, &slot, "one more", ""), block);
+    EXPECT_STREQ(block->slots[slot].pszValue, "");
+    slot = other;
+    EXPECT_EQ(PshTLIBIUpdateValue(block, &slot, "one more", "x"), nullptr) << "the slot of another key";
+    block = PshTLIBICheckSpace(block, 100000);
+    hash.reset(block);
+    EXPECT_GT(hash->nStrFree, 100000);
+    EXPECT_STREQ(SzTLIBSzHashGetValue(hash.get(), "and another"), "z");
+}
+
+TEST(Hash, TinyTables)
+{
+    Hash none(PshTLIBIHashAllocator(0, 0));
+    EXPECT_EQ(SetValue(none, "k", "v"), -1);
+    EXPECT_EQ(SzTLIBSzHashGetValue(none.get(), "k"), nullptr);
+    Hash one(PshTLIBIHashAllocator(1, 100));
+    EXPECT_EQ(SetValue(one, "k", "v"), 0);
+    EXPECT_EQ(SetValue(one, "l", "v"), -1) << "4 * 1 - 5 is no number of slots";
+    EXPECT_EQ(Pairs(one.get()), (PairMap{{"k", "v"}}));
+    Hash two(PshTLIBIHashAllocator(2, 0));
+    for (const char *key : {"a", "b", "c", "d", "e", "f"})
+        EXPECT_GE(SetValue(two, key, key), 0);
+    EXPECT_EQ(TLIBSzHashPairNum(two.get()), 6);
+}
+
+TEST(Hash, RefusesWithOrWithoutACode)
+{
+    const Hash hash = MakeHash({{"k", "v"}});
+    TLIBSZHASH *addr = hash.get();
+    TLIBSZHASH *null = nullptr;
+    TLIBSZLIST *no_list = nullptr;
+    int slot = 0;
+    test::ForgetFault();
+    EXPECT_EQ(SzTLIBSzHashGetValue(nullptr, "k"), nullptr);
+    EXPECT_EQ(SzTLIBSzHashGetValue(addr, nullptr), nullptr);
+    EXPECT_EQ(SzTLIBSzHashGetValue(addr, "missing"), nullptr);
+    EXPECT_EQ(SzTLIBSzHashRemoveKey(nullptr, "k"), nullptr);
+    EXPECT_EQ(SzTLIBSzHashRemoveKey(addr, nullptr), nullptr);
+    EXPECT_EQ(TLIBSzHashSetValue(nullptr, "k", "v"), -1);
+    EXPECT_EQ(TLIBSzHashSetValue(&null, "k", "v"), -1);
+    EXPECT_EQ(TLIBSzHashSetValue(&addr, nullptr, "v"), -1);
+    EXPECT_EQ(TLIBSzHashSetValue(&addr, "k", nullptr), -1);
+    EXPECT_EQ(TLIBSzHashGetLength(nullptr), -1);
+    EXPECT_EQ(TLIBSzHashEnumKey(nullptr, nullptr), -1);
+    EXPECT_EQ(TLIBIGetLookDict(nullptr, "k"), -1);
+    EXPECT_EQ(TLIBISetLookDict(addr, nullptr), -1);
+    EXPECT_EQ(TLIBIInsertPair(addr, addr->nSlot, "x", "y"), -1);
+    EXPECT_EQ(TLIBIInsertPair(addr, -1, "x", "y"), -1);
+    EXPECT_EQ(TLIBICopyHash(nullptr, addr), -1);
+    EXPECT_EQ(PshTLIBICheckSpace(nullptr, 1), nullptr);
+    EXPECT_EQ(PshTLIBIReSizeHash(nullptr, 1, 1), nullptr);
+    EXPECT_EQ(PshTLIBIInsertNewPair(addr, nullptr, "x", "y"), nullptr);
+    EXPECT_EQ(PshTLIBIUpdateValue(addr, &slot, "k", nullptr), nullptr);
+    PslSzHashRemoveAll(nullptr);
+    TLIBSzHashFree(nullptr);
+    TLIBIHashDump(nullptr);
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS) << "none of these records a code";
+
+    EXPECT_EQ(TLIBSzHashPairNum(nullptr), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "hash_pair_num", 26}));
+    EXPECT_EQ(PshTLIBSzHashAlloc(-1), nullptr);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "hash_allocator"}));
+    EXPECT_EQ(PshTLIBIHashAllocator(-1, 9), nullptr);
+    EXPECT_EQ(TLIBSzHashEnumKey(addr, &no_list), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "list_insert", 131}));
+    EXPECT_EQ(Pairs(hash.get()), (PairMap{{"k", "v"}}));
+}
+
+TEST(HashDump, ShowsPairsAndWhatWasRemoved)
+{
+    const Hash hash = MakeHash({{"a", "1"}, {"b", "2"}});
+    SzTLIBSzHashRemoveKey(hash.get(), "b");
+    testing::internal::CaptureStdout();
+    TLIBIHashDump(hash.get());
+    const std::string text = testing::internal::GetCapturedStdout();
+    EXPECT_THAT(text, testing::HasSubstr("slots[4] a=1\nslots[5] removed\nslots[6] empty\n"));
+    EXPECT_THAT(text, testing::HasSubstr("nStrSize =512 \t nStrFree =504 \t nSlot =31 \t nPair =1 \t"));
+}
+
+}  // namespace

@@ -1,0 +1,498 @@
+// Lists: what each function gives, refuses, and leaves behind.
+#include "tavo_list.h"
+
+#include "support/captured_log.h"
+#include "support/container_text.h"
+#include "support/fault_state.h"
+
+#include <gmock/gmock.h>
+
+#include <algorithm>
+#include <climits>
+#include <cstring>
+#include <functional>
+
+using test::Fault;
+using test::Items;
+using test::LastFault;
+using test::List;
+using test::MakeList;
+using test::Moving;
+using testing::ElementsAre;
+using testing::IsEmpty;
+using Texts = std::vector<std::string>;
+
+namespace {
+
+int Insert(List &list, int i, const char *text)
+{
+    return Moving(list, [&](auto **addr) { return TLIBSzListInsert(addr, i, text); });
+}
+
+int Set(List &list, int i, const char *text)
+{
+    return Moving(list, [&](auto **addr) { return TLIBSzListSet(addr, i, text); });
+}
+
+TEST(ListAlloc, CountsInWordsOfTheAppliance)
+{
+    const struct {
+        int asked;
+        int size;
+    } rows[] = {{0, 512}, {-7, 512}, {511, 512}, {512, 512}, {513, 513}, {4099, 4099}};
+    for (const auto &row : rows) {
+        const List list(PslTLIBSzListAlloc(row.asked));
+        ASSERT_TRUE(list);
+        EXPECT_EQ(list->nSize, row.size);
+        EXPECT_EQ(list->nFree, row.size - 24);
+        EXPECT_EQ(list->nItem, 0);
+        EXPECT_EQ(TLIBSzListSorted(list.get()), 0);
+        EXPECT_EQ(*list->pszEmpty, '\0');
+    }
+}
+
+// 97 items of one character need 97 * (4 + 2) bytes: the 82nd does not fit in 488.
+TEST(ListInsert, GrowsWhenTheCountedBytesAreUsedUp)
+{
+    List list(PslTLIBSzListAlloc(0));
+    for (int i = 0; i < 81; ++i)
+        ASSERT_EQ(Insert(list, i, "x"), i);
+    EXPECT_EQ(list->nSize, 512);
+    EXPECT_EQ(list->nFree, 2);
+    EXPECT_EQ(Insert(list, 81, "x"), 81);
+    EXPECT_EQ(list->nSize, 1024);
+    EXPECT_EQ(list->nFree, 1024 - 24 - 82 * 6);
+
+    // A table of nothing but holes uses every counted slot.
+    List holes(PslTLIBSzListAlloc(0));
+    EXPECT_EQ(Insert(holes, 120, "abc"), 120);
+    EXPECT_EQ(holes->nSize, 512);
+    EXPECT_EQ(holes->nFree, 0);
+    EXPECT_STREQ(holes->pszItem[120], "abc");
+
+    const std::string large(100000, 'y');
+    EXPECT_EQ(Insert(holes, 121, large.c_str()), 121);
+    EXPECT_EQ(holes->nSize, 512 * 256);
+    EXPECT_EQ(holes->pszItem[121], large);
+}
+
+TEST(ListInsert, LeavesHolesThatNothingFinds)
+{
+    List list(PslTLIBSzListAlloc(0));
+    EXPECT_EQ(Insert(list, 5, "five"), 5);
+    EXPECT_THAT(Items(list.get()), ElementsAre("", "", "", "", "", "five"));
+    EXPECT_EQ(list->nFree, 488 - 5 - 24);
+    EXPECT_EQ(TLIBSzListFind(list.get(), ""), -1);
+    EXPECT_EQ(TLIBSzListCaseFind(list.get(), ""), -1);
+    EXPECT_EQ(Insert(list, 2, ""), 2);
+    EXPECT_EQ(TLIBSzListFind(list.get(), ""), 2) << "an empty string that was stored is no hole";
+
+    TLIBISzListClean(list.get());
+    EXPECT_THAT(Items(list.get()), ElementsAre("", "five"));
+    EXPECT_EQ(list->nFree, 488 - 5 - 1 - 8);
+}
+
+TEST(ListInsert, SortedListIgnoresTheIndex)
+{
+    List list = MakeList({"m", "c", "x"}, TLIB_SZLIST_SORTED);
+    EXPECT_EQ(Insert(list, 77, "d"), 1);
+    EXPECT_EQ(Insert(list, 0, "z"), 4);
+    EXPECT_EQ(Insert(list, 3, "B"), 0);
+    EXPECT_THAT(Items(list.get()), ElementsAre("B", "c", "d", "m", "x", "z"));
+    const char *older = list->pszItem[3];
+    EXPECT_EQ(Insert(list, 9, "m"), 3);
+    EXPECT_NE(list->pszItem[3], older) << "the new copy stands before the old one";
+    EXPECT_EQ(list->pszItem[4], older);
+
+    List folded = MakeList({"b", "A", "C"}, TLIB_SZLIST_CASESORTED);
+    EXPECT_EQ(Insert(folded, 0, "Ä"), 3);
+    EXPECT_EQ(Insert(folded, 0, "B"), 1);
+    EXPECT_THAT(Items(folded.get()), ElementsAre("A", "B", "b", "C", "Ä"));
+    EXPECT_EQ(TLIBSzListCaseFind(folded.get(), "ä"), 4);
+}
+
+// A string that a list handed out may go back into that list, also when it moves meanwhile.
+TEST(ListInsert, TakesItsOwnStrings)
+{
+    for (const bool removed : {false, true}) {
+        List list = MakeList({"the text that goes round", "b"});
+        int moves = 0;
+        for (int i = 0; i < 200; ++i) {
+            const TLIBSZLIST *before = list.get();
+            const char *own = removed ? SzTLIBSzListShift(list.get()) : SzTLIBSzListGet(list.get(), 0);
+            const std::string text = own;
+            const int at = Moving(list, [&](auto **addr) { return TLIBSzListPush(addr, own); });
+            ASSERT_EQ(list->pszItem[at], text);
+            moves += list.get() != before;
+        }
+        EXPECT_GT(moves, 0);
+    }
+    List list = MakeList({"abcdef", "x"});
+    EXPECT_EQ(Set(list, 0, list->pszItem[0] + 2), 0);
+    EXPECT_EQ(Set(list, 1, list->pszItem[0] + 1), 1);
+    EXPECT_THAT(Items(list.get()), ElementsAre("cdef", "def"));
+}
+
+TEST(ListRemove, ShiftPopAndEmpty)
+{
+    List list = MakeList({"a", "b", "c", "d"});
+    EXPECT_STREQ(SzTLIBSzListRemove(list.get(), 1), "b");
+    EXPECT_STREQ(SzTLIBSzListShift(list.get()), "a");
+    EXPECT_STREQ(SzTLIBSzListPop(list.get()), "d");
+    EXPECT_THAT(Items(list.get()), ElementsAre("c"));
+    EXPECT_EQ(list->nFree, 488 - 4 - 4 * 2) << "removed strings keep their bytes";
+
+    list->fMode = TLIB_SZLIST_SORTED;
+    TLIBSzListRemoveAll(list.get());
+    EXPECT_EQ(list->nFree, 488);
+    EXPECT_EQ(TLIBSzListSorted(list.get()), TLIB_SZLIST_SORTED);
+    EXPECT_EQ(Insert(list, 0, "again"), 0);
+    EXPECT_EQ(list->nFree, 488 - 4 - 6);
+}
+
+TEST(ListExpand, DoublesAndReclaims)
+{
+    List list = MakeList({"gone", "kept", "also"});
+    SzTLIBSzListShift(list.get());
+    Insert(list, 4, "far");
+    list->fMode = 2;
+    list.reset(PslTLIBISzListExpand(list.release()));
+    EXPECT_EQ(list->nSize, 1024);
+    EXPECT_EQ(list->nFree, 1024 - 24 - 5 * 4 - 5 - 5 - 4);
+    EXPECT_EQ(list->fMode, 2);
+    EXPECT_THAT(Items(list.get()), ElementsAre("kept", "also", "", "", "far"));
+    EXPECT_EQ(list->pszItem[2], list->pszEmpty);
+}
+
+TEST(ListSet, ReplacesInPlaceOrBelow)
+{
+    List list = MakeList({"long text", "b"});
+    Insert(list, 3, "c");
+    const int free = list->nFree;
+    EXPECT_EQ(Set(list, 0, "short"), 0);
+    EXPECT_EQ(list->nFree, free);
+    EXPECT_EQ(Set(list, 1, "longer"), 1);
+    EXPECT_EQ(list->nFree, free - 7);
+    EXPECT_EQ(Set(list, 2, ""), 2);
+    EXPECT_EQ(list->pszItem[2], list->pszEmpty);
+    EXPECT_EQ(Set(list, 2, "was a hole"), 2);
+    EXPECT_EQ(*list->pszEmpty, '\0');
+    EXPECT_THAT(Items(list.get()), ElementsAre("short", "longer", "was a hole", "c"));
+
+    const std::string large(3000, 'x');
+    EXPECT_EQ(Set(list, 1, large.c_str()), 1);
+    EXPECT_EQ(list->nSize, 4096);
+    EXPECT_THAT(Items(list.get()), ElementsAre("short", large, "was a hole", "c"));
+}
+
+TEST(ListSet, SortsASortedListAgain)
+{
+    List list = MakeList({"a", "k", "z"}, TLIB_SZLIST_SORTED);
+    EXPECT_EQ(Set(list, 0, "y"), 1);
+    EXPECT_THAT(Items(list.get()), ElementsAre("k", "y", "z"));
+
+    List folded = MakeList({"a", "K", "z"}, TLIB_SZLIST_CASESORTED);
+    test::ForgetFault();
+    EXPECT_EQ(Set(folded, 0, "Y"), -1) << "the search by bytes refuses such a list";
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "list_find", 37}));
+    EXPECT_THAT(Items(folded.get()), ElementsAre("K", "Y", "z"));
+}
+
+TEST(ListSort, OnlyAnUnsortedListIsSorted)
+{
+    List list = MakeList({"b", "C", "a"}, TLIB_SZLIST_SORTED);
+    EXPECT_THAT(Items(list.get()), ElementsAre("C", "a", "b"));
+    TLIBSzListSortItems(list.get(), TLIB_SZLIST_CASESORTED);
+    EXPECT_THAT(Items(list.get()), ElementsAre("C", "a", "b"));
+    EXPECT_EQ(TLIBSzListSorted(list.get()), TLIB_SZLIST_CASESORTED);
+
+    const struct {
+        int mode;
+        Texts order;
+    } rows[] = {
+        {0, {"b", "", "C", "a"}}, {1, {"C", "a", "b"}},     {16, {"a", "b", "C"}},
+        {17, {"C", "a", "b"}},    {2, {"b", "", "C", "a"}}, {32, {"b", "", "C", "a"}},
+    };
+    for (const auto &row : rows) {
+        List holed = MakeList({"b"});
+        Insert(holed, 2, "C");
+        Insert(holed, 3, "a");
+        TLIBSzListSortItems(holed.get(), row.mode);
+        EXPECT_EQ(Items(holed.get()), row.order) << row.mode;
+        EXPECT_EQ(TLIBSzListSorted(holed.get()), row.mode);
+        EXPECT_EQ(holed->nFree, 488 - 6 - 4 * holed->nItem);
+        // Anything but 1 and 16 is searched from the front.
+        const int at = TLIBSzListFind(holed.get(), "a");
+        EXPECT_EQ(at, row.mode == 16 ? -1 : static_cast<int>(std::ranges::find(row.order, "a") - row.order.begin()));
+    }
+}
+
+// Text that is not UTF-8 compares with nothing, but still has to have one place in the order.
+TEST(ListSort, PutsWhatIsNotUtf8Last)
+{
+    List list = MakeList({"\xff", "b", "a\xc3", "A", "\xe4pfel", "Z"}, TLIB_SZLIST_CASESORTED);
+    EXPECT_THAT(Items(list.get()), ElementsAre("A", "b", "Z", "a\xc3", "\xe4pfel", "\xff"));
+    EXPECT_EQ(TLIBSzListCaseFind(list.get(), "a"), 0);
+    EXPECT_EQ(TLIBSzListCaseFind(list.get(), "\xff"), -1);
+    EXPECT_EQ(Insert(list, 0, "c"), 2);
+
+    const Texts texts = {"a", "B", "Ä", "ß", "SS", "\xff", "a\xff", "A\xff", "", "\xc0\x80", "z"};
+    for (const std::string &x : texts) {
+        for (const std::string &y : texts) {
+            const char *left = x.c_str();
+            const char *right = y.c_str();
+            const int order = TLIBISzListUTF8StrCasecmp(&left, &right);
+            EXPECT_EQ(order > 0, TLIBISzListUTF8StrCasecmp(&right, &left) < 0) << x << " " << y;
+            for (const std::string &z : texts) {
+                const char *third = z.c_str();
+                if (order <= 0 && TLIBISzListUTF8StrCasecmp(&right, &third) <= 0) {
+                    EXPECT_LE(TLIBISzListUTF8StrCasecmp(&left, &third), 0) << x << " " << y << " " << z;
+                }
+            }
+        }
+    }
+}
+
+TEST(ListFind, BinarySearchTellsThePlace)
+{
+    const List list = MakeList({"b", "d", "f"}, TLIB_SZLIST_SORTED);
+    const struct {
+        const char *text;
+        int hi, lo, fold;
+        int result;
+    } rows[] = {
+        {"b", 2, 0, 0, 0},    {"f", 2, 0, 0, 2},          {"a", 2, 0, 0, -1},  {"c", 2, 0, 0, -2},
+        {"e", 2, 0, 0, -3},   {"g", 2, 0, 0, -4},         {"D", 2, 0, 1, 1},   {"D", 2, 0, 0, -1},
+        {"d", -1, 0, 0, -1},  {"b", 2, 1, 0, -2},         {"f", 1, 0, 0, -3},  {"f", 99, 0, 0, 2},
+        {"z", 99, 50, 0, -4}, {"a", INT_MAX, -50, 0, -1}, {"b", -5, 0, 0, -1}, {"\xff", 2, 0, 1, -1},
+    };
+    for (const auto &row : rows)
+        EXPECT_EQ(TLIBISzListFind(list.get(), row.hi, row.lo, row.text, row.fold), row.result)
+            << row.text << " " << row.hi << " " << row.lo;
+    EXPECT_EQ(TLIBSzListFind(list.get(), "c"), -1);
+}
+
+TEST(ListSets, KeepTheOrderOfTheFirst)
+{
+    enum { kAnd, kOr, kSub };
+    const struct {
+        int operation;
+        Texts a;
+        int a_mode;
+        Texts b;
+        int b_mode;
+        Texts result;
+    } rows[] = {
+        {kAnd, {"c", "a", "b", "a"}, 0, {"a", "x", "c"}, 0, {"c", "a", "a"}},
+        {kSub, {"c", "a", "b", "a"}, 0, {"a", "x", "c"}, 0, {"b"}},
+        {kOr, {"c", "a"}, 0, {"z", "a", "y", "z"}, 0, {"c", "a", "z", "y", "z"}},
+        {kAnd, {"C", "a", "B"}, 0, {"c", "b", "X"}, 16, {"C", "B"}},
+        {kSub, {"C", "a", "B"}, 0, {"c", "b", "X"}, 16, {"a"}},
+        {kOr, {"C", "a"}, 0, {"c", "A", "X"}, 16, {"C", "a", "X"}},
+        {kAnd, {"c", "a", "B"}, 0, {"c", "b"}, 1, {"c"}},
+        {kAnd, {"a", "b", "b", "d"}, 1, {"b", "c", "d"}, 1, {"b", "b", "d"}},
+        {kSub, {"a", "b", "b", "d"}, 1, {"b", "c", "d"}, 1, {"a"}},
+        {kOr, {"b", "d"}, 1, {"a", "b", "e", "c"}, 1, {"a", "b", "c", "d", "e"}},
+        {kAnd, {"A", "b", "d"}, 16, {"a", "D"}, 16, {"A", "d"}},
+        {kSub, {"A", "b", "d"}, 16, {"a", "D"}, 16, {"b"}},
+        {kOr, {"b", "D"}, 16, {"c", "B", "a"}, 16, {"a", "b", "c", "D"}},
+        {kOr, {"b", "d"}, 1, {"e", "b", "a"}, 0, {"a", "b", "d", "e"}},
+        {kSub, {"B", "d"}, 16, {"b", "D"}, 0, {"B", "d"}},
+        {kAnd, {}, 0, {"x"}, 0, {}},
+        {kSub, {"x"}, 0, {}, 1, {"x"}},
+        {kOr, {}, 0, {}, 0, {}},
+    };
+    for (const auto &row : rows) {
+        for (const int flags : {0, static_cast<int>(TLIB_SZLIST_NEW)}) {
+            SCOPED_TRACE(testing::PrintToString(row.a) + testing::PrintToString(row.b) + std::to_string(flags));
+            // A hole in either takes no part.
+            List a = MakeList(row.a, row.a_mode);
+            List b = MakeList(row.b, row.b_mode);
+            if (!row.a_mode)
+                Insert(a, a->nItem + 1, row.a.empty() ? "" : SzTLIBSzListPop(a.get()));
+            if (!row.b_mode)
+                Insert(b, b->nItem + 1, row.b.empty() ? "" : SzTLIBSzListPop(b.get()));
+            if (!row.a_mode && row.a.empty())
+                TLIBSzListRemoveAll(a.get());
+            const Texts a_before = Items(a.get());
+            const Texts b_before = Items(b.get());
+            test::ForgetFault();
+            TLIBSZLIST *a_addr = a.release();
+            TLIBSZLIST *result = row.operation == kAnd  ? PslTLIBSzListAnd(a_addr, b.get(), flags)
+                                 : row.operation == kOr ? PslTLIBSzListOr(&a_addr, b.get(), flags)
+                                                        : PslTLIBSzListSub(a_addr, b.get(), flags);
+            a.reset(a_addr);
+            ASSERT_TRUE(result);
+            const List owned(flags ? result : nullptr);
+            EXPECT_EQ(flags ? result != a.get() : result == a.get(), true);
+            EXPECT_EQ(Items(result), row.result);
+            EXPECT_EQ(result->fMode, row.a_mode);
+            if (flags) {
+                EXPECT_EQ(Items(a.get()), a_before);
+            }
+            EXPECT_EQ(Items(b.get()), b_before);
+            EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+        }
+    }
+}
+
+TEST(ListSets, OfAListWithItself)
+{
+    for (const int mode : {0, 1, 16}) {
+        const Texts texts = {"a", "b", "c"};
+        List list = MakeList(texts, mode);
+        EXPECT_EQ(PslTLIBSzListAnd(list.get(), list.get(), 0), list.get());
+        EXPECT_EQ(Items(list.get()), texts);
+        TLIBSZLIST *addr = list.release();
+        EXPECT_EQ(PslTLIBSzListOr(&addr, addr, 0), addr);
+        list.reset(addr);
+        EXPECT_EQ(Items(list.get()), texts);
+        EXPECT_EQ(PslTLIBSzListSub(list.get(), list.get(), 0), list.get());
+        EXPECT_THAT(Items(list.get()), IsEmpty());
+    }
+}
+
+TEST(ListDump2Str, JoinsWithinTheBuffer)
+{
+    const struct {
+        Texts items;
+        const char *separator;
+        int size;
+        int result;
+        const char *text;
+    } rows[] = {
+        {{"a", "bc", "d"}, ", ", 10, 0, "a, bc, d"},
+        {{"a", "bc", "d"}, ", ", 9, 0, "a, bc, d"},
+        {{"a", "bc", "d"}, ", ", 8, -1, "a, bc, "},
+        {{"a", "bc", "d"}, ", ", 3, -1, "a,"},
+        {{"a", "bc", "d"}, ", ", 1, -1, ""},
+        {{"a", "bc"}, "", 9, 0, "abc"},
+        {{"a", "", "", "b"}, "--", 20, 4, "a------b"},
+        {{"", "", "x"}, ":", 20, 1, "::x"},
+        {{"", ""}, ":", 1, -1, ""},
+        {{}, ":", 1, 0, ""},
+    };
+    for (const auto &row : rows) {
+        const List list = MakeList(row.items);
+        char buffer[24];
+        std::memset(buffer, '#', sizeof buffer);
+        test::ForgetFault();
+        EXPECT_EQ(TLIBSzListDump2Str(list.get(), row.separator, buffer, row.size), row.result);
+        std::string expected(static_cast<size_t>(row.size), '\0');
+        expected.replace(0, std::strlen(row.text), row.text);
+        EXPECT_EQ(std::string(buffer, static_cast<size_t>(row.size)), expected) << "the rest is cleared";
+        EXPECT_EQ(buffer[row.size], '#');
+        EXPECT_EQ(LastFault(), row.result < 0 ? (Fault{ERR_TRUNCATED, "list_dump_2_str", 50}) : Fault{});
+    }
+}
+
+TEST(ListDump, PrintsItemsAndHeader)
+{
+    const List list = MakeList({"one", "two"});
+    testing::internal::CaptureStdout();
+    TLIBISzListDump(list.get());
+    char expected[512];
+    std::snprintf(expected, sizeof expected,
+                  "%p start address \n%p ,%p pszItem[0]=one\n%p ,%p pszItem[1]=two\n"
+                  "nSize =512 \t nItem =2 \t nFree =472 \t fMode =0 \t EndofFree=%p\n",
+                  static_cast<void *>(list.get()), static_cast<void *>(list->pszItem[0]),
+                  static_cast<void *>(&list->pszItem[0]), static_cast<void *>(list->pszItem[1]),
+                  static_cast<void *>(&list->pszItem[1]), static_cast<void *>(list->EndofFree));
+    EXPECT_EQ(testing::internal::GetCapturedStdout(), expected);
+}
+
+TEST(List, RefusesAndChangesNothing)
+{
+    const List list = MakeList({"a", "b"});
+    const List sorted = MakeList({"a", "b"}, TLIB_SZLIST_SORTED);
+    const List folded = MakeList({"a", "b"}, TLIB_SZLIST_CASESORTED);
+    TLIBSZLIST *null = nullptr;
+    TLIBSZLIST *addr = list.get();
+    TLIBSZLIST *sorted_addr = sorted.get();
+    char buffer[4];
+    const struct {
+        const char *name;
+        std::function<bool()> call;  // true: the failure value came back
+        Fault fault;
+    } rows[] = {
+#define INT(call)                                                                                                      \
+#call, [&] {                                                                                                       \
+        return (call) == -1;                                                                                           \
+    }
+#define PTR(call)                                                                                                      \
+#call, [&] {                                                                                                       \
+        return (call) == nullptr;                                                                                      \
+    }
+        {PTR(SzTLIBSzListGet(nullptr, 0)), {ERR_BAD_PARAMETERS, "list_get", 30}},
+        {PTR(SzTLIBSzListGet(addr, -1)), {ERR_BAD_PARAMETERS, "list_get", 30}},
+        {PTR(SzTLIBSzListGet(addr, 2)), {ERR_BAD_PARAMETERS, "list_get", 30}},
+        {INT(TLIBSzListInsert(nullptr, 0, "x")), {ERR_BAD_PARAMETERS, "list_insert", 45}},
+        {INT(TLIBSzListInsert(&null, 0, "x")), {ERR_BAD_PARAMETERS, "list_insert", 45}},
+        {INT(TLIBSzListInsert(&addr, 0, nullptr)), {ERR_BAD_PARAMETERS, "list_insert", 45}},
+        {INT(TLIBSzListInsert(&addr, -1, "x")), {ERR_BAD_PARAMETERS, "list_insert", 45}},
+        {INT(TLIBSzListInsert(&addr, INT_MAX, "x")), {ERR_OUT_OF_MEMORY, "list_insert", 72}},
+        {INT(TLIBSzListInsert(&addr, 1 << 30, "x")), {ERR_OUT_OF_MEMORY, "list_insert", 72}},
+        {INT(TLIBSzListPush(&null, "x")), {ERR_BAD_PARAMETERS, "list_insert", 131}},
+        {INT(TLIBSzListPush(nullptr, "x")), {ERR_BAD_PARAMETERS, "list_insert", 131}},
+        {INT(TLIBSzListPush(&addr, nullptr)), {ERR_BAD_PARAMETERS, "list_insert", 131}},
+        {INT(TLIBSzListUnshift(nullptr, "x")), {ERR_BAD_PARAMETERS, "list_insert", 167}},
+        {INT(TLIBSzListUnshift(&addr, nullptr)), {ERR_BAD_PARAMETERS, "list_insert", 167}},
+        {PTR(SzTLIBSzListRemove(nullptr, 0)), {ERR_BAD_PARAMETERS, "list_remove", 40}},
+        {PTR(SzTLIBSzListRemove(addr, 2)), {ERR_BAD_PARAMETERS, "list_remove", 40}},
+        {PTR(SzTLIBSzListRemove(addr, -1)), {ERR_BAD_PARAMETERS, "list_remove", 40}},
+        {PTR(SzTLIBSzListShift(nullptr)), {ERR_BAD_PARAMETERS, "list_remove", 78}},
+        {PTR(SzTLIBSzListPop(nullptr)), {ERR_BAD_PARAMETERS, "list_remove", 110}},
+        {INT(TLIBSzListSet(nullptr, 0, "x")), {ERR_BAD_PARAMETERS, "list_set"}},
+        {INT(TLIBSzListSet(&null, 0, "x")), {ERR_BAD_PARAMETERS, "list_set"}},
+        {INT(TLIBSzListSet(&addr, 2, "x")), {ERR_BAD_PARAMETERS, "list_set"}},
+        {INT(TLIBSzListSet(&addr, 0, nullptr)), {ERR_BAD_PARAMETERS, "list_set"}},
+        {INT(TLIBSzListFind(nullptr, "a")), {ERR_BAD_PARAMETERS, "list_find", 37}},
+        {INT(TLIBSzListFind(addr, nullptr)), {ERR_BAD_PARAMETERS, "list_find", 37}},
+        {INT(TLIBSzListFind(folded.get(), "a")), {ERR_BAD_PARAMETERS, "list_find", 37}},
+        {INT(TLIBSzListCaseFind(nullptr, "a")), {ERR_BAD_PARAMETERS, "list_case_find", 46}},
+        {INT(TLIBSzListCaseFind(sorted.get(), "a")), {ERR_BAD_PARAMETERS, "list_case_find", 46}},
+        {INT(TLIBSzListSorted(nullptr)), {ERR_BAD_PARAMETERS, "list_sorted", 26}},
+        {PTR(PslTLIBSzListAnd(nullptr, addr, 0)), {ERR_BAD_PARAMETERS, "list_and", 59}},
+        {PTR(PslTLIBSzListAnd(addr, nullptr, 0)), {ERR_BAD_PARAMETERS, "list_and", 59}},
+        {PTR(PslTLIBSzListAnd(sorted.get(), folded.get(), 0)), {ERR_BAD_PARAMETERS, "list_and", 69}},
+        {PTR(PslTLIBSzListAnd(addr, sorted.get(), 1)), {ERR_BAD_PARAMETERS, "list_and"}},
+        {PTR(PslTLIBSzListOr(&null, addr, 0)), {ERR_BAD_PARAMETERS, "list_or", 61}},
+        {PTR(PslTLIBSzListOr(&addr, nullptr, 0)), {ERR_BAD_PARAMETERS, "list_or", 61}},
+        {PTR(PslTLIBSzListOr(&sorted_addr, folded.get(), 0)), {ERR_BAD_PARAMETERS, "list_or", 73}},
+        {PTR(PslTLIBSzListSub(nullptr, addr, 0)), {ERR_BAD_PARAMETERS, "list_sub", 58}},
+        {PTR(PslTLIBSzListSub(sorted.get(), folded.get(), 0x1000)), {ERR_BAD_PARAMETERS, "list_sub", 68}},
+        {PTR(PslTLIBSzListSub(addr, sorted.get(), 0x1001)), {ERR_BAD_PARAMETERS, "list_sub"}},
+        {INT(TLIBSzListDump2Str(nullptr, ",", buffer, 4)), {ERR_BAD_PARAMETERS, "list_dump_2_str", 36}},
+        {INT(TLIBSzListDump2Str(addr, nullptr, buffer, 4)), {ERR_BAD_PARAMETERS, "list_dump_2_str", 36}},
+        {INT(TLIBSzListDump2Str(addr, ",", nullptr, 4)), {ERR_BAD_PARAMETERS, "list_dump_2_str", 36}},
+        {INT(TLIBSzListDump2Str(addr, ",", buffer, 0)), {ERR_BAD_PARAMETERS, "list_dump_2_str", 36}},
+        {INT(TLIBISzListFind(nullptr, 0, 0, "a", 0)), {ERR_BAD_PARAMETERS, "list_find"}},
+        {PTR(PslTLIBISzListExpand(nullptr)), {ERR_BAD_PARAMETERS, "list_expand"}},
+        // Looking in vain is no failure.
+        {INT(TLIBSzListFind(addr, "x")), {}},
+        {INT(TLIBSzListFind(sorted.get(), "x")), {}},
+        {INT(TLIBSzListCaseFind(addr, "\xff")), {}},
+        {INT(TLIBSzListCaseFind(folded.get(), "\xff")), {}},
+#undef INT
+#undef PTR
+    };
+    test::CapturedLog log;
+    for (const auto &row : rows) {
+        test::ForgetFault();
+        log.Clear();
+        EXPECT_TRUE(row.call()) << row.name;
+        EXPECT_EQ(LastFault(), row.fault) << row.name;
+        EXPECT_THAT(log.Texts(),
+                    row.fault.module == "list_dump_2_str" ? Texts{"list_dump_2_str:37 Parameter error"} : Texts{});
+        EXPECT_EQ(addr, list.get());
+        for (const List *untouched : {&list, &sorted, &folded})
+            ASSERT_THAT(Items(untouched->get()), ElementsAre("a", "b")) << row.name;
+    }
+    TLIBSzListFree(nullptr);
+    TLIBSzListRemoveAll(nullptr);
+    TLIBSzListSortItems(nullptr, 1);
+    TLIBISzListClean(nullptr);
+    TLIBISzListDump(nullptr);
+}
+
+}  // namespace

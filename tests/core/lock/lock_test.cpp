@@ -1,0 +1,450 @@
+// The locks: counting, refusals, time-outs, forked children, and what others may have put in /tmp.
+#include "tavo_lock.h"
+
+#include "support/fault_state.h"
+
+#include <gtest/gtest.h>
+
+#include <cerrno>
+#include <climits>
+#include <cstring>
+#include <ctime>
+#include <filesystem>
+#include <fstream>
+#include <functional>
+#include <string>
+#include <vector>
+
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+#include <sys/syscall.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace fs = std::filesystem;
+using test::Fault;
+using test::LastFault;
+
+namespace {
+
+constexpr long kRetry = 50'000'000;  // nanoseconds
+
+// Sleeps are recorded, not slept; both hooks may change the world or fail.
+std::vector<long> sleeps;
+std::function<bool(timespec *left)> on_sleep;         // false: interrupted
+std::function<bool(int fd, int operation)> on_flock;  // false: errno is the answer
+
+}  // namespace
+
+extern "C" {
+
+int nanosleep(const struct timespec *wanted, struct timespec *left)
+{
+    sleeps.push_back(wanted->tv_sec * 1'000'000'000L + wanted->tv_nsec);
+    return on_sleep && !on_sleep(left) ? -1 : 0;
+}
+
+int flock(int fd, int operation)
+{
+    if (on_flock && !on_flock(fd, operation))
+        return -1;
+    return static_cast<int>(syscall(SYS_flock, fd, operation));
+}
+}
+
+namespace {
+
+TLIBLOCKFILE &Entry(unsigned bit)
+{
+    TLIBLOCKFILE *entry = rgslckList;
+    while (entry->fLockBit != bit)
+        ++entry;
+    return *entry;
+}
+
+class Lock : public testing::Test {
+  protected:
+    void SetUp() override
+    {
+        if (!fs::exists("/etc.defaults/tavoinfo.conf"))
+            GTEST_SKIP() << "only in an appliance root";
+        Forget();
+    }
+    void TearDown() override { Forget(); }
+
+    static void Forget()
+    {
+        on_sleep = nullptr;
+        on_flock = nullptr;
+        sleeps.clear();
+        ErrTLIBFileCloseLock();
+        fs::remove_all("/tmp/lock");
+        test::ForgetFault();
+    }
+};
+
+// Another program's lock: another open file, which excludes this process as well as any other.
+class ForeignHold {
+  public:
+    ForeignHold(unsigned bit, int operation)
+    {
+        EXPECT_EQ(ErrTLIBILockCheckDir(), 0);
+        fd_ = ::open(Entry(bit).szPath, O_RDONLY | O_CLOEXEC);
+        EXPECT_EQ(syscall(SYS_flock, fd_, operation | LOCK_NB), 0);
+    }
+    ~ForeignHold() { Release(); }
+    void Release()
+    {
+        if (fd_ >= 0)
+            ::close(fd_);
+        fd_ = -1;
+    }
+
+  private:
+    int fd_ = -1;
+};
+
+// What another program would find.
+bool IsFree(unsigned bit, int operation)
+{
+    const int fd = ::open(Entry(bit).szPath, O_RDONLY | O_CLOEXEC);
+    const bool free = syscall(SYS_flock, fd, operation | LOCK_NB) == 0;
+    ::close(fd);
+    return free;
+}
+
+// Runs in a forked child; true when `body` is.
+bool InChild(const std::function<bool()> &body)
+{
+    const pid_t pid = ::fork();
+    if (pid == 0)
+        ::_exit(body() ? 0 : 1);
+    int status = -1;
+    ::waitpid(pid, &status, 0);
+    return status == 0;
+}
+
+size_t OpenDescriptors()
+{
+    return static_cast<size_t>(std::distance(fs::directory_iterator("/proc/self/fd"), fs::directory_iterator()));
+}
+
+TEST(LockTable, IsTheKnownOne)
+{
+    const struct {
+        const char *name;
+        unsigned bit;
+    } rows[] = {{"tavoinfo", 0x800},  {"pw", 0x10},          {"gr", 0x20},          {"rc", 0x80},
+                {"host", 0x100},      {"smb", 0x40},         {"exports", 0x200},    {"nw", 0x400},
+                {"apple", 0x1000},    {"snmp", 0x2000},      {"win", 0x4000},       {"tapebkp", 0x8000},
+                {"connect", 0x10000}, {"usbidmap", 0x20000}, {"duseruid", 0x40000}, {"dusergid", 0x80000},
+                {"fstab", 0x100000},  {"hotswap", 0x200000}, {"space", 0x400000},   {"ttys1", 0x800000}};
+    ASSERT_EQ(std::size(rgslckList), std::size(rows) + 1);
+    for (size_t i = 0; i < std::size(rows); ++i) {
+        EXPECT_EQ(rgslckList[i].szPath, std::string("/tmp/lock/lock_") + rows[i].name);
+        EXPECT_EQ(rgslckList[i].fLockBit, rows[i].bit) << rows[i].name;
+        EXPECT_EQ(rgslckList[i].pfLock, nullptr);
+        EXPECT_EQ(rgslckList[i].nRef, 0);
+    }
+    EXPECT_STREQ(rgslckList[20].szPath, "");
+    EXPECT_EQ(rgslckList[20].fLockBit, 0u);
+}
+
+TEST_F(Lock, NestsUntilTheLastUnlock)
+{
+    ASSERT_EQ(ErrTLIBFileLock(0x806, 0), 0);
+    ASSERT_EQ(ErrTLIBFileLock(0x816, 0), 0);
+    EXPECT_EQ(Entry(0x800).nRef, 2);
+    EXPECT_EQ(Entry(0x800).nMode, 6);
+    EXPECT_EQ(Entry(0x10).nRef, 1);
+    EXPECT_NE(::fcntl(::fileno(Entry(0x800).pfLock), F_GETFD) & FD_CLOEXEC, 0);
+
+    EXPECT_EQ(ErrTLIBFileUnlock(0x800), 0);
+    EXPECT_FALSE(IsFree(0x800, LOCK_SH));
+    EXPECT_EQ(ErrTLIBFileUnlock(0xF | 0x800 | 0x20), 0) << "the low bits and locks that are not held do not count";
+    EXPECT_EQ(Entry(0x800).pfLock, nullptr);
+    EXPECT_EQ(Entry(0x800).nRef, 0);
+    EXPECT_TRUE(IsFree(0x800, LOCK_EX));
+    EXPECT_FALSE(IsFree(0x10, LOCK_SH));
+    EXPECT_EQ(ErrTLIBFileUnlock(0x10), 0);
+
+    ASSERT_EQ(ErrTLIBFileLock(0x805, 0), 0);
+    EXPECT_TRUE(IsFree(0x800, LOCK_SH));
+    EXPECT_FALSE(IsFree(0x800, LOCK_EX));
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+}
+
+TEST_F(Lock, SharedDoesNotBecomeExclusive)
+{
+    const struct {
+        unsigned held;
+        unsigned wanted;
+        bool refused;
+    } rows[] = {{5, 6, true},  {5, 2, true},  {1, 6, true},  {1, 2, true}, {5, 5, false},
+                {5, 1, false}, {6, 5, false}, {2, 1, false}, {2, 6, false}};
+    for (const auto &row : rows) {
+        SCOPED_TRACE(std::to_string(row.held) + " to " + std::to_string(row.wanted));
+        ASSERT_EQ(ErrTLIBFileLock(0x20 | row.held, 0), 0);
+        test::ForgetFault();
+        // lock_tavoinfo stands before lock_gr, so it is taken first and must be given back.
+        EXPECT_EQ(ErrTLIBFileLock(0x820 | row.wanted, 60), row.refused ? -1 : 0);
+        EXPECT_EQ(Entry(0x20).nRef, row.refused ? 1 : 2);
+        EXPECT_EQ(Entry(0x20).nMode, static_cast<int>(row.held));
+        EXPECT_EQ(Entry(0x800).pfLock == nullptr, row.refused);
+        EXPECT_EQ(LastFault(), (row.refused ? Fault{ERR_LOCK_FAILED, "file_lock", 87} : Fault{}));
+        ErrTLIBFileCloseLock();
+    }
+    EXPECT_TRUE(sleeps.empty()) << "waiting cannot help";
+}
+
+TEST_F(Lock, TriesAgainTwentyTimesASecond)
+{
+    ForeignHold busy(0x100, LOCK_EX);
+    const size_t descriptors = OpenDescriptors();
+    const struct {
+        int timeout;
+        size_t retries;
+    } rows[] = {{0, 0}, {1, 20}, {3, 60}, {-1, 0}, {INT_MIN, 0}};
+    for (const auto &row : rows) {
+        sleeps.clear();
+        test::ForgetFault();
+        EXPECT_EQ(ErrTLIBFileLock(0x906, row.timeout), -1);
+        EXPECT_EQ(sleeps, std::vector<long>(row.retries, kRetry)) << row.timeout;
+        EXPECT_EQ(LastFault(), (Fault{ERR_LOCK_FAILED, "file_lock", 87}));
+        EXPECT_EQ(OpenDescriptors(), descriptors);
+        EXPECT_EQ(Entry(0x800).pfLock, nullptr) << "all or nothing";
+        EXPECT_EQ(Entry(0x100).pfLock, nullptr);
+        EXPECT_EQ(Entry(0x100).nRef, 0);
+    }
+
+    // The last retry counts, and a limit of many years is none that overflows.
+    for (const int timeout : {1, INT_MAX}) {
+        ForeignHold again(0x400, LOCK_SH);
+        sleeps.clear();
+        on_sleep = [&](timespec *) {
+            if (sleeps.size() == 20)
+                again.Release();
+            return true;
+        };
+        EXPECT_EQ(ErrTLIBFileLock(0x406, timeout), 0);
+        EXPECT_EQ(sleeps.size(), 20u);
+        ErrTLIBFileUnlock(0x400);
+    }
+}
+
+// Programs have children, and children die while one waits: that is no answer about the lock and shortens no wait.
+TEST_F(Lock, SignalsNeitherFailNorShortenAWait)
+{
+    ForeignHold busy(0x100, LOCK_EX);
+    on_sleep = [](timespec *left) {
+        if (sleeps.back() != kRetry)
+            return true;
+        *left = {0, kRetry / 4};
+        errno = EINTR;
+        return false;
+    };
+    EXPECT_EQ(ErrTLIBFileLock(0x106, 1), -1);
+    EXPECT_EQ(sleeps.size(), 40u);
+    EXPECT_EQ(sleeps[1], kRetry / 4);
+    busy.Release();
+
+    int interruptions = 3;
+    on_flock = [&](int, int) {
+        errno = EINTR;
+        return interruptions-- <= 0;
+    };
+    for (const unsigned mode : {1u, 2u, 5u, 6u}) {
+        interruptions = 3;
+        EXPECT_EQ(ErrTLIBFileLock(0x100 | mode, 0), 0);
+        ErrTLIBFileUnlock(0x100);
+    }
+}
+
+TEST_F(Lock, RefusesWhatIsNoWayToLock)
+{
+    for (const unsigned request : {0x800u, 0x803u, 0x804u, 0x807u, 0x808u, 0x80Cu, 0x80Eu, 0x1000806u}) {
+        test::ForgetFault();
+        EXPECT_EQ(ErrTLIBFileLock(request, 0), -1) << std::hex << request;
+        EXPECT_EQ(LastFault(), (Fault{ERR_LOCK_FAILED, "file_lock", 87}));
+        EXPECT_EQ(Entry(0x800).pfLock, nullptr);
+    }
+}
+
+TEST_F(Lock, UnlockReportsAndStillCloses)
+{
+    ASSERT_EQ(ErrTLIBFileLock(0x836, 0), 0);
+    on_flock = [](int, int operation) {
+        errno = EIO;
+        return operation != LOCK_UN;
+    };
+    EXPECT_EQ(ErrTLIBFileUnlock(0x830), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_UNLOCK_FAILED, "file_unlock", 38}));
+    for (const unsigned bit : {0x800u, 0x10u, 0x20u}) {
+        EXPECT_EQ(Entry(bit).pfLock, nullptr);
+        EXPECT_TRUE(IsFree(bit, LOCK_EX));
+    }
+}
+
+TEST_F(Lock, ForkedChildrenLeaveTheirParentsLocksAlone)
+{
+    ASSERT_EQ(ErrTLIBFileLock(0x816, 0), 0);
+    ASSERT_EQ(ErrTLIBFileLock(0x806, 0), 0);
+    EXPECT_TRUE(InChild([] {
+        return ErrTLIBFileCloseLock() == 0 && !Entry(0x800).pfLock && Entry(0x800).nRef == 0 &&
+               ErrTLIBFileLock(0x806, 0) == -1;
+    }));
+    EXPECT_FALSE(IsFree(0x800, LOCK_SH)) << "closing in a child frees nothing";
+    EXPECT_TRUE(InChild([] {
+        return ErrTLIBFileResetLock(0x800) == 0 && Entry(0x800).nRef == 1 && !Entry(0x10).pfLock &&
+               Entry(0x10).nRef == 0;
+    }));
+    EXPECT_FALSE(IsFree(0x10, LOCK_SH));
+    EXPECT_EQ(Entry(0x800).nRef, 2);
+}
+
+TEST_F(Lock, CloseReportsAFailure)
+{
+    ASSERT_EQ(ErrTLIBFileLock(0x836, 0), 0);
+    ::close(::fileno(Entry(0x20).pfLock));
+    EXPECT_EQ(ErrTLIBFileResetLock(0x800), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_UNLOCK_FAILED, "file_reset_lock"}));
+    EXPECT_EQ(Entry(0x20).pfLock, nullptr);
+    EXPECT_EQ(Entry(0x10).pfLock, nullptr);
+    ::close(::fileno(Entry(0x800).pfLock));
+    EXPECT_EQ(ErrTLIBFileCloseLock(), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_UNLOCK_FAILED, "file_close_lock"}));
+    EXPECT_EQ(Entry(0x800).pfLock, nullptr);
+}
+
+TEST_F(Lock, DirectoryAndFilesAreMadeWhateverTheUmask)
+{
+    const mode_t mask = ::umask(077);
+    EXPECT_EQ(ErrTLIBFileLock(0x806, 0), 0);
+    ::umask(mask);
+    struct stat st;
+    ASSERT_EQ(::stat("/tmp/lock", &st), 0);
+    EXPECT_EQ(st.st_mode, S_IFDIR | 0755u);
+    for (const TLIBLOCKFILE *entry = rgslckList; entry->fLockBit; ++entry) {
+        ASSERT_EQ(::lstat(entry->szPath, &st), 0) << entry->szPath;
+        EXPECT_EQ(st.st_mode, S_IFREG | 0644u) << entry->szPath;
+        EXPECT_EQ(st.st_size, 0);
+    }
+    ASSERT_EQ(::unlink("/tmp/lock/lock_smb"), 0);
+    EXPECT_EQ(ErrTLIBILockCheckDir(), 0);
+    EXPECT_TRUE(fs::is_regular_file("/tmp/lock/lock_smb"));
+}
+
+TEST_F(Lock, TrapsAtTheDirectory)
+{
+    fs::create_directory("/tmp/elsewhere");
+    ASSERT_EQ(::chmod("/tmp/elsewhere", 0700), 0);
+    const struct {
+        const char *what;
+        std::function<bool()> plant;
+    } rows[] = {
+        {"link",
+         [] {
+             return ::symlink("/tmp/elsewhere", "/tmp/lock") == 0;
+         }},
+        {"dangling link",
+         [] {
+             return ::symlink("/tmp/nowhere", "/tmp/lock") == 0;
+         }},
+        {"file",
+         [] {
+             return std::ofstream("/tmp/lock").is_open();
+         }},
+        {"FIFO",
+         [] {
+             return ::mkfifo("/tmp/lock", 0666) == 0;
+         }},
+        {"open directory",
+         [] {
+             return ::mkdir("/tmp/lock", 0) == 0 && ::chmod("/tmp/lock", 01777) == 0;
+         }},
+        {"group's directory",
+         [] {
+             return ::mkdir("/tmp/lock", 0) == 0 && ::chmod("/tmp/lock", 0775) == 0;
+         }},
+        {"foreign directory",
+         [] {
+             return ::mkdir("/tmp/lock", 0755) == 0 && ::chown("/tmp/lock", 1000, 0) == 0;
+         }},
+    };
+    for (const auto &row : rows) {
+        ASSERT_TRUE(row.plant()) << row.what;
+        test::ForgetFault();
+        EXPECT_EQ(ErrTLIBFileLock(0x806, 0), -1) << row.what;
+        EXPECT_EQ(LastFault(), (Fault{ERR_CREATE_FAILED, "lock_check_dir", 37})) << row.what;
+        EXPECT_TRUE(fs::is_empty("/tmp/elsewhere")) << row.what;
+        EXPECT_FALSE(fs::exists("/tmp/nowhere")) << row.what;
+        fs::remove_all("/tmp/lock");
+    }
+    struct stat st;
+    ASSERT_EQ(::stat("/tmp/elsewhere", &st), 0);
+    EXPECT_EQ(st.st_mode & 07777u, 0700u);
+    fs::remove_all("/tmp/elsewhere");
+}
+
+TEST_F(Lock, TrapsAtALockFile)
+{
+    const char *const path = "/tmp/lock/lock_pw";
+    std::ofstream("/tmp/victim") << "kept";
+    const struct {
+        const char *what;
+        std::function<bool()> plant;
+    } rows[] = {
+        {"link",
+         [&] {
+             return ::symlink("/tmp/victim", path) == 0;
+         }},
+        {"dangling link",
+         [&] {
+             return ::symlink("/tmp/nologin", path) == 0;
+         }},
+        {"FIFO",
+         [&] {
+             return ::mkfifo(path, 0644) == 0;
+         }},
+        {"directory",
+         [&] {
+             return ::mkdir(path, 0755) == 0;
+         }},
+        {"foreign file",
+         [&] {
+             return std::ofstream(path).is_open() && ::chown(path, 1000, 0) == 0;
+         }},
+    };
+    for (const auto &row : rows) {
+        fs::remove_all("/tmp/lock");
+        ASSERT_EQ(::mkdir("/tmp/lock", 0755), 0);
+        ASSERT_TRUE(row.plant()) << row.what;
+        test::ForgetFault();
+        EXPECT_EQ(ErrTLIBFileLock(0x806, 0), -1) << row.what;
+        EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "lock_check_dir", 45})) << row.what;
+        EXPECT_FALSE(fs::exists("/tmp/nologin")) << row.what;
+    }
+    EXPECT_EQ(fs::file_size("/tmp/victim"), 4u);
+    fs::remove("/tmp/victim");
+}
+
+// A cleaner of /tmp, or a second instance of the appliance's start-up, removes the files of a lock that is being taken:
+// whoever comes next locks a new file, so a lock on the old one would exclude nobody.
+TEST_F(Lock, HoldsTheFileThatHasTheName)
+{
+    for (const bool whole_directory : {false, true}) {
+        int cleanings = 3;
+        on_flock = [&](int, int) {
+            if (cleanings-- > 0)
+                fs::remove_all(whole_directory ? "/tmp/lock" : "/tmp/lock/lock_tavoinfo");
+            return true;
+        };
+        ASSERT_EQ(ErrTLIBFileLock(0x806, 0), 0);
+        on_flock = nullptr;
+        EXPECT_FALSE(IsFree(0x800, LOCK_SH));
+        EXPECT_EQ(ErrTLIBFileUnlock(0x800), 0);
+    }
+}
+
+}  // namespace

@@ -1,0 +1,275 @@
+// Tokens, trimming, colon encoding, and UTF-8 without regard to case.
+#include "tavo_str.h"
+
+#include "support/fault_state.h"
+
+#include <gmock/gmock.h>
+
+#include <climits>
+#include <cstring>
+#include <random>
+#include <string>
+#include <vector>
+
+using test::Fault;
+using test::LastFault;
+using Texts = std::vector<std::string>;
+
+namespace {
+
+Texts Tokens(char *(*cut)(char **, const char *), std::string text, const char *delimiters)
+{
+    Texts tokens;
+    char *cursor = text.data();
+    while (const char *token = cut(&cursor, delimiters))
+        tokens.push_back(token);
+    EXPECT_EQ(cursor, nullptr);
+    return tokens;
+}
+
+TEST(StrTok, SkipsEmptyTokensWhereSepReturnsThem)
+{
+    const struct {
+        const char *text;
+        const char *delimiters;
+        Texts tokens;
+        Texts separated;
+    } rows[] = {
+        {"a=b", "=", {"a", "b"}, {"a", "b"}},
+        {"==a==b=", "=", {"a", "b"}, {"", "", "a", "", "b", ""}},
+        {"a, b;c", ",;", {"a", " b", "c"}, {"a", " b", "c"}},
+        {"", "=", {}, {""}},
+        {"::", ":", {}, {"", "", ""}},
+        {"no delimiter", "", {"no delimiter"}, {"no delimiter"}},
+    };
+    for (const auto &row : rows) {
+        EXPECT_EQ(Tokens(TLIBStrTok, row.text, row.delimiters), row.tokens) << row.text;
+        EXPECT_EQ(Tokens(TLIBIStrTok, row.text, row.delimiters), row.tokens) << row.text;
+        EXPECT_EQ(Tokens(TLIBStrSep, row.text, row.delimiters), row.separated) << row.text;
+    }
+    char text[] = "=x";
+    char *cursor = text;
+    char *none = nullptr;
+    for (const auto cut : {TLIBStrTok, TLIBIStrTok, TLIBStrSep}) {
+        EXPECT_EQ(cut(nullptr, "="), nullptr);
+        EXPECT_EQ(cut(&cursor, nullptr), nullptr);
+        EXPECT_EQ(cut(&none, "="), nullptr);
+    }
+    EXPECT_EQ(cursor, text);
+    EXPECT_STREQ(text, "=x");
+}
+
+TEST(StrTrimSpace, WhiteSpaceThenOnePairOfQuotes)
+{
+    const struct {
+        const char *text;
+        const char *trimmed;
+    } rows[] = {
+        {" \t\r\nabc\n", "abc"},
+        {"", ""},
+        {" \n\t ", ""},
+        {"\"a b\"", "a b"},
+        {" \" a \" ", " a "},
+        {"\"", "\""},
+        {"\"\"", ""},
+        {"\"a", "\"a"},
+        {"a\"", "a\""},
+        {"\"\"a\"\"", "\"a\""},
+        {"\va\f", "\va\f"},
+        {"a b", "a b"},
+        {"  \"\"\"  ", "\""},
+        {"'a'", "'a'"},
+    };
+    for (const auto &row : rows) {
+        const int length = static_cast<int>(std::strlen(row.trimmed));
+        for (const bool with_target : {false, true}) {
+            std::string source = row.text;
+            EXPECT_EQ(TLIBStrTrimSpace(source.data(), with_target ? source.data() : nullptr), length);
+            EXPECT_STREQ(source.c_str(), row.trimmed);
+        }
+        std::string source = row.text;
+        char target[16];
+        std::memset(target, '#', sizeof target);
+        EXPECT_EQ(TLIBStrTrimSpace(source.data(), target), length);
+        EXPECT_STREQ(target, row.trimmed);
+        EXPECT_EQ(target[length + 1], '#');
+        EXPECT_EQ(source, row.text);
+    }
+}
+
+TEST(StrTrimSpace, RefusesOverlap)
+{
+    char text[32] = "       ab  ";
+    for (char *target : {text + 8, text + 1, text + 11}) {
+        test::ForgetFault();
+        EXPECT_EQ(TLIBStrTrimSpace(text, target), -1) << target - text;
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "str_trim_space"}));
+    }
+    EXPECT_EQ(TLIBStrTrimSpace(text + 2, text), -1) << "the result would run into the source";
+    EXPECT_STREQ(text, "       ab  ");
+    EXPECT_EQ(TLIBStrTrimSpace(nullptr, text), -1);
+    EXPECT_EQ(TLIBStrTrimSpace(text, text + 12), 2);
+    EXPECT_STREQ(text + 12, "ab");
+    EXPECT_EQ(TLIBStrTrimSpace(text + 4, text), 2) << "beside each other";
+    EXPECT_STREQ(text, "ab");
+}
+
+TEST(StrColon, EncodesWhatAFieldCannotHold)
+{
+    const struct {
+        const char *text;
+        const char *encoded;
+    } rows[] = {
+        {"", ""},
+        {"Tom's NAS (50% full)", "Tom's NAS (50% full)"},
+        {"a:b::", "a%3Ab%3A%3A"},
+        {"two\nlines\r", "two%0Alines%0D"},
+        {"%3A", "%253A"},
+        {"%25", "%2525"},
+        {"%", "%"},
+        {"%2", "%2"},
+        {"%%3A", "%%253A"},
+        {"%:", "%%3A"},
+        {"%2:", "%2%3A"},
+        {"%3a", "%3a"},
+        {"Zo\xc3\xab \xff", "Zo\xc3\xab \xff"},
+    };
+    for (const auto &row : rows) {
+        char buffer[64];
+        const int length = static_cast<int>(std::strlen(row.encoded)) + 1;
+        EXPECT_EQ(TLIBStrEncodeColon(row.text, nullptr, 0), length);
+        EXPECT_EQ(TLIBStrEncodeColon(row.text, buffer, length), length);
+        EXPECT_STREQ(buffer, row.encoded);
+        EXPECT_EQ(TLIBStrDecodeColon(buffer, nullptr, 0), static_cast<int>(std::strlen(row.text)) + 1);
+        EXPECT_EQ(TLIBStrDecodeColon(buffer, buffer, sizeof buffer), static_cast<int>(std::strlen(row.text)) + 1);
+        EXPECT_STREQ(buffer, row.text);
+    }
+}
+
+TEST(StrColon, EveryTextComesBack)
+{
+    std::mt19937 random(7);
+    const std::string likely = "%%%::\n\r0123AaDd5";
+    for (int round = 0; round < 20000; ++round) {
+        std::string text(random() % 24, ' ');
+        for (char &byte : text)
+            byte = random() % 4 ? likely[random() % likely.size()] : static_cast<char>(1 + random() % 255);
+        char encoded[80];
+        char decoded[80];
+        ASSERT_GT(TLIBStrEncodeColon(text.c_str(), encoded, sizeof encoded), 0);
+        ASSERT_EQ(std::strpbrk(encoded, ":\r\n"), nullptr) << text;
+        ASSERT_EQ(TLIBStrDecodeColon(encoded, decoded, sizeof decoded), static_cast<int>(text.size()) + 1);
+        ASSERT_EQ(decoded, text);
+    }
+}
+
+TEST(StrColon, RefusesAndWritesNothing)
+{
+    char buffer[16] = "#######";
+    const struct {
+        int result;
+        Fault fault;
+    } rows[] = {
+        {TLIBStrEncodeColon("a:b", buffer, 5), LastFault()},   {TLIBStrDecodeColon("a%3Ab", buffer, 3), LastFault()},
+        {TLIBStrEncodeColon(nullptr, buffer, 8), LastFault()}, {TLIBStrEncodeColon("a", nullptr, 8), LastFault()},
+        {TLIBStrEncodeColon("a", buffer, -1), LastFault()},    {TLIBStrDecodeColon(nullptr, buffer, 8), LastFault()},
+        {TLIBStrEncodeColon(buffer, buffer, 8), LastFault()},  {TLIBStrDecodeColon(buffer + 2, buffer, 8), LastFault()},
+    };
+    for (const auto &row : rows)
+        EXPECT_EQ(row.result, -1);
+    EXPECT_EQ(rows[0].fault, (Fault{ERR_NOT_ENOUGH_MEMORY, "str_encode_colon"}));
+    EXPECT_EQ(rows[1].fault, (Fault{ERR_NOT_ENOUGH_MEMORY, "str_decode_colon"}));
+    EXPECT_EQ(rows[2].fault, (Fault{ERR_BAD_PARAMETERS, "str_encode_colon"}));
+    EXPECT_EQ(rows[7].fault, (Fault{ERR_BAD_PARAMETERS, "str_decode_colon"}));
+    EXPECT_STREQ(buffer, "#######");
+}
+
+TEST(Utf8Upper, FollowsTheUnicodeTables)
+{
+    const struct {
+        const char *text;
+        const char *upper;
+    } rows[] = {
+        {"", ""},
+        {"admin", "ADMIN"},
+        {"Ünïcode", "ÜNÏCODE"},
+        {"straße", "STRASSE"},
+        {"ﬃ", "FFI"},
+        {"ıi", "II"},
+        {"λόγος", "ΛΌΓΟΣ"},
+        {"ŉ", "ʼN"},
+        {"用户1", "用户1"},
+        {"𐐨", "𐐀"},
+        {"_-. $", "_-. $"},
+        {"ΐΐΐΐΐΐΐ", "\u0399\u0308\u0301\u0399\u0308\u0301\u0399\u0308\u0301\u0399\u0308\u0301"
+                    "\u0399\u0308\u0301\u0399\u0308\u0301\u0399\u0308\u0301"},
+    };
+    for (const auto &row : rows) {
+        char buffer[128];
+        std::strcpy(buffer, row.text);
+        const int length = static_cast<int>(std::strlen(row.upper)) + 1;
+        EXPECT_EQ(TLIBUnicodeUTF8StrUpper(row.text, nullptr, 0), length) << row.text;
+        EXPECT_EQ(TLIBUnicodeUTF8StrUpper(buffer, buffer, length), length);
+        EXPECT_STREQ(buffer, row.upper);
+        test::ForgetFault();
+        EXPECT_EQ(TLIBUnicodeUTF8StrUpper(row.text, buffer, length - 1), -1);
+        EXPECT_EQ(LastFault(), (Fault{ERR_NOT_ENOUGH_MEMORY, "unicode_utf8_str_upper"}));
+        EXPECT_STREQ(buffer, row.upper);
+    }
+}
+
+TEST(Utf8, RefusesWhatIsNotUtf8)
+{
+    const char *const rows[] = {"\xff", "a\xc3",    "\xc3(", "\xc0\x80", "\xed\xa0\x80", "\xf4\x90\x80\x80",
+                                "\x80", "b\xe2\x82"};
+    for (const char *text : rows) {
+        char buffer[16] = "#";
+        test::ForgetFault();
+        EXPECT_EQ(TLIBUnicodeUTF8StrUpper(text, buffer, sizeof buffer), -1);
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "unicode_utf8_str_upper"}));
+        EXPECT_STREQ(buffer, "#");
+        EXPECT_EQ(TLIBUnicodeUTF8StrCountChar(text), -1);
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "unicode_utf8_str_count_char"}));
+        // Also behind the place where the order is already decided.
+        for (const std::string before : {"", "z", "Ä"}) {
+            EXPECT_EQ(TLIBUnicodeUTF8StrCaseCmp((before + text).c_str(), "a"), -2);
+            EXPECT_EQ(TLIBUnicodeUTF8StrCaseCmp("a", (before + text).c_str()), -2);
+        }
+        EXPECT_EQ(TLIBUnicodeUTF8StrCaseCmp(text, text), -2);
+    }
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "unicode_utf8_str_case_cmp"}));
+    EXPECT_EQ(TLIBUnicodeUTF8StrCaseCmp(nullptr, "a"), -2);
+    EXPECT_EQ(TLIBUnicodeUTF8StrCaseCmp("a", nullptr), -2);
+    EXPECT_EQ(TLIBUnicodeUTF8StrCountChar(nullptr), -1);
+    EXPECT_EQ(TLIBUnicodeUTF8StrUpper(nullptr, nullptr, 0), -1);
+    EXPECT_EQ(TLIBUnicodeUTF8StrUpper("a", nullptr, 5), -1);
+}
+
+TEST(Utf8CountChar, CountsCodePoints)
+{
+    EXPECT_EQ(TLIBUnicodeUTF8StrCountChar(""), 0);
+    EXPECT_EQ(TLIBUnicodeUTF8StrCountChar("abc"), 3);
+    EXPECT_EQ(TLIBUnicodeUTF8StrCountChar("äß用𐐀"), 4);
+}
+
+TEST(Utf8CaseCmp, OrdersFoldedText)
+{
+    const struct {
+        const char *left;
+        const char *right;
+        int order;
+    } rows[] = {
+        {"", "", 0},       {"", "a", -1},    {"Admin", "aDMIN", 0},
+        {"a", "B", -1},    {"_", "A", -1},   {"abc", "ABCD", -1},
+        {"Ä", "ä", 0},     {"ß", "SS", 0},   {"Straße", "STRASSEN", -1},
+        {"ﬃ", "ffi", 0},   {"ﬃ", "ffj", -1}, {"ΣΊΣΥΦΟΣ", "σίσυφος", 0},
+        {"z", "ä", -1},    {"𐐀", "𐐨", 0},    {"\xef\xbf\xbd", "𐐀", -1},
+        {"ffi", "ﬃb", -1}, {"İ", "i̇", 0},    {"K", "k", 0},
+    };
+    for (const auto &row : rows) {
+        EXPECT_EQ(TLIBUnicodeUTF8StrCaseCmp(row.left, row.right), row.order) << row.left << " " << row.right;
+        EXPECT_EQ(TLIBUnicodeUTF8StrCaseCmp(row.right, row.left), -row.order) << row.left << " " << row.right;
+    }
+}
+
+}  // namespace

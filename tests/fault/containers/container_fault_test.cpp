@@ -1,0 +1,201 @@
+// Memory runs out at every single allocation of every function of lists, hashes and strings: the right code, nothing
+// changed, nothing left allocated.
+#include "tavo_hash.h"
+#include "tavo_list.h"
+#include "tavo_str.h"
+
+#include "support/container_text.h"
+#include "support/failing_malloc.h"
+#include "support/fault_state.h"
+
+#include <gtest/gtest.h>
+
+#include <functional>
+
+using test::Fault;
+using test::Hash;
+using test::List;
+
+namespace {
+
+const std::string kLarge(3000, 'x');
+
+// What a call works on: a list and a hash that have no room left for much, and what they hold.
+struct World {
+    List list = test::MakeList({"b", "a", "c"});
+    List other = test::MakeList({"c", "d", kLarge});
+    List sorted = test::MakeList({"c", "d"}, TLIB_SZLIST_SORTED);
+    Hash hash;
+    List made;
+    Hash made_hash;
+    char buffer[16] = "#";
+
+    World()
+    {
+        hash.reset(PshTLIBSzHashAlloc(64));
+        test::Moving(hash, [](auto **addr) { return TLIBSzHashSetValue(addr, "key", "value"); });
+        test::Moving(list, [](auto **addr) { return TLIBSzListInsert(addr, 4, "hole before"); });
+        TLIBISzListClean(list.get());
+    }
+
+    auto Contents() const
+    {
+        return std::tuple(test::Items(list.get()), list->nSize, list->nFree, list->fMode, test::Items(other.get()),
+                          test::Items(sorted.get()), test::Pairs(hash.get()), hash->nStrFree, hash->nSlot,
+                          std::string(buffer));
+    }
+};
+
+// A result that is a container is kept for the world to free; whether there is one.
+bool Keep(World &world, TLIBSZLIST *list)
+{
+    if (list && list != world.list.get())
+        world.made.reset(list);
+    return list != nullptr;
+}
+
+bool Keep(World &world, TLIBSZHASH *hash)
+{
+    world.made_hash.reset(hash);
+    return hash != nullptr;
+}
+
+struct Row {
+    const char *name;
+    std::function<bool(World &)> call;  // true: it has succeeded
+    Fault fault;
+    int allocations;
+};
+
+void FailEachAllocation(const Row &row)
+{
+    SCOPED_TRACE(row.name);
+    test::EachAllocation faults;
+    while (faults.Next()) {
+        World world;
+        const auto before = world.Contents();
+        test::ForgetFault();
+        faults.Arm();
+        const bool succeeded = row.call(world);
+        faults.Disarm();
+        EXPECT_EQ(succeeded, !faults.Fired());
+        if (faults.Fired()) {
+            EXPECT_EQ(test::LastFault(), row.fault);
+            EXPECT_EQ(faults.LeftAllocated(), 0);
+            EXPECT_EQ(world.Contents(), before);
+        } else {
+            EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+        }
+    }
+    EXPECT_EQ(faults.Count(), row.allocations);
+}
+
+// Calls a function that may move the world's list or hash.
+template <class Owner, class Call>
+bool Moves(Owner &owner, Call call)
+{
+    return test::Moving(owner, call) >= 0;
+}
+
+TEST(ContainerFault, EveryAllocationFailsOnce)
+{
+    const Fault no_code = {};
+    const Row rows[] = {
+        {"list alloc", [](World &w) { return Keep(w, PslTLIBSzListAlloc(9000)); }, {0x0200, "list_alloc", 42}, 1},
+        {"list insert",
+         [](World &w) { return Moves(w.list, [](auto **a) { return TLIBSzListInsert(a, 1, kLarge.c_str()); }); },
+         {0x0200, "list_insert", 72},
+         1},
+        {"list push far",
+         [](World &w) { return Moves(w.list, [](auto **a) { return TLIBSzListInsert(a, 5000, "x"); }); },
+         {0x0200, "list_insert", 72},
+         1},
+        {"list unshift",
+         [](World &w) { return Moves(w.list, [](auto **a) { return TLIBSzListUnshift(a, kLarge.c_str()); }); },
+         {0x0200, "list_insert", 72},
+         1},
+        {"list set",
+         [](World &w) { return Moves(w.list, [](auto **a) { return TLIBSzListSet(a, 1, kLarge.c_str()); }); },
+         {0x0200, "list_set"},
+         1},
+        {"list expand",
+         [](World &w) {
+             TLIBSZLIST *grown = PslTLIBISzListExpand(w.list.get());
+             if (grown) {
+                 (void)w.list.release();
+                 w.list.reset(grown);
+             }
+             return grown != nullptr;
+         },
+         {0x0200, "list_expand", 42},
+         1},
+        {"list and, new",
+         [](World &w) { return Keep(w, PslTLIBSzListAnd(w.list.get(), w.other.get(), TLIB_SZLIST_NEW)); },
+         {0x0200, "list_and"},
+         1},
+        {"list and, in place",
+         [](World &w) { return Keep(w, PslTLIBSzListAnd(w.list.get(), w.sorted.get(), 0)); },
+         {},
+         0},
+        {"list and, with itself",
+         [](World &w) { return Keep(w, PslTLIBSzListAnd(w.list.get(), w.list.get(), 0)); },
+         {0x0200, "list_and"},
+         1},
+        {"list sub, new",
+         [](World &w) { return Keep(w, PslTLIBSzListSub(w.list.get(), w.sorted.get(), TLIB_SZLIST_NEW)); },
+         {0x0200, "list_sub"},
+         1},
+        {"list or, new",
+         [](World &w) {
+             TLIBSZLIST *a = w.list.get();
+             return Keep(w, PslTLIBSzListOr(&a, w.other.get(), TLIB_SZLIST_NEW));
+         },
+         {0x0200, "list_or"},
+         3},
+        {"list or, in place and growing",
+         [](World &w) {
+             TLIBSZLIST *a = w.list.release();
+             TLIBSZLIST *b = w.other.get();
+             const bool done = PslTLIBSzListOr(&a, b, 0) != nullptr;
+             w.list.reset(a);
+             return done;
+         },
+         {0x0200, "list_or"},
+         3},
+        {"list sort", [](World &w) { return TLIBSzListSortItems(w.list.get(), 16), true; }, {}, 0},
+        {"list case find", [](World &w) { return TLIBSzListCaseFind(w.list.get(), "C") >= 0; }, {}, 0},
+        {"hash alloc", [](World &w) { return Keep(w, PshTLIBSzHashAlloc(100)); }, {0x0200, "hash_allocator", 39}, 1},
+        {"hash set, new key",
+         [](World &w) {
+             return Moves(w.hash, [](auto **a) { return TLIBSzHashSetValue(a, "another", kLarge.c_str()); });
+         },
+         no_code, 1},
+        {"hash set, longer value",
+         [](World &w) { return Moves(w.hash, [](auto **a) { return TLIBSzHashSetValue(a, "key", kLarge.c_str()); }); },
+         no_code, 1},
+        {"hash resize",
+         [](World &w) {
+             TLIBSZHASH *resized = PshTLIBIReSizeHash(w.hash.get(), 50, 500);
+             if (resized) {
+                 (void)w.hash.release();
+                 w.hash.reset(resized);
+             }
+             return resized != nullptr;
+         },
+         no_code, 1},
+        {"hash enum",
+         [](World &w) { return Moves(w.list, [&](auto **a) { return TLIBSzHashEnumKey(w.hash.get(), a); }); },
+         {},
+         0},
+        {"upper",
+         [](World &w) { return TLIBUnicodeUTF8StrUpper("short", w.buffer, 16) > 0; },
+         {0x0200, "unicode_utf8_str_upper"},
+         1},
+        {"case compare", [](World &) { return TLIBUnicodeUTF8StrCaseCmp(kLarge.c_str(), kLarge.c_str()) == 0; }, {}, 0},
+        {"colon", [](World &w) { return TLIBStrEncodeColon("a:b", w.buffer, 16) > 0; }, {}, 0},
+    };
+    for (const Row &row : rows)
+        FailEachAllocation(row);
+}
+
+}  // namespace

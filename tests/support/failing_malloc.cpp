@@ -1,0 +1,150 @@
+// Takes the place of the allocator in a test program.
+#include "support/failing_malloc.h"
+
+#include <cerrno>
+#include <cstddef>
+#include <new>
+
+#if defined(__SANITIZE_ADDRESS__)
+#define TEST_WITH_ASAN 1
+#elif defined(__has_feature)
+#if __has_feature(address_sanitizer)
+#define TEST_WITH_ASAN 1
+#endif
+#endif
+
+#ifdef TEST_WITH_ASAN
+#define REAL(name) __interceptor_##name
+#else
+#define REAL(name) __libc_##name
+#endif
+
+extern "C" {
+void *REAL(malloc)(size_t);
+void *REAL(calloc)(size_t, size_t);
+void *REAL(realloc)(void *, size_t);
+void REAL(free)(void *);
+}
+
+namespace test {
+namespace {
+
+struct Armed {
+    bool on = false;
+    int until_failure = 0;
+    bool fired = false;
+    int live = 0;
+};
+
+constinit thread_local Armed armed;
+
+// True for the allocation that is to fail.
+bool Fails()
+{
+    if (!armed.on)
+        return false;
+    if (--armed.until_failure == 0) {
+        armed.fired = true;
+        errno = ENOMEM;
+        return true;
+    }
+    return false;
+}
+
+void *Counted(void *block)
+{
+    armed.live += armed.on && block;
+    return block;
+}
+
+}  // namespace
+
+bool EachAllocation::Next()
+{
+    if (!fired_)
+        return false;
+    ++round_;
+    return true;
+}
+
+void EachAllocation::Arm()
+{
+    armed = {true, round_, false, 0};
+}
+
+void EachAllocation::Disarm()
+{
+    if (!armed.on)
+        return;
+    armed.on = false;
+    fired_ = armed.fired;
+    left_allocated_ = armed.live;
+}
+
+}  // namespace test
+
+using test::armed;
+using test::Counted;
+using test::Fails;
+
+extern "C" {
+
+void *malloc(size_t size)
+{
+    return Fails() ? nullptr : Counted(REAL(malloc)(size));
+}
+
+void *calloc(size_t count, size_t size)
+{
+    return Fails() ? nullptr : Counted(REAL(calloc)(count, size));
+}
+
+void *realloc(void *block, size_t size)
+{
+    if (Fails())
+        return nullptr;
+    return block ? REAL(realloc)(block, size) : Counted(REAL(realloc)(block, size));
+}
+
+void free(void *block)
+{
+    armed.live -= armed.on && block;
+    REAL(free)(block);
+}
+}
+
+#ifdef TEST_WITH_ASAN
+// The sanitizer has operators of its own, which do not come to malloc; the library's and the test's must.
+void *operator new(size_t size)
+{
+    void *block = malloc(size ? size : 1);
+    if (!block)
+        throw std::bad_alloc();
+    return block;
+}
+
+void *operator new[](size_t size)
+{
+    return operator new(size);
+}
+
+void operator delete(void *block) noexcept
+{
+    free(block);
+}
+
+void operator delete[](void *block) noexcept
+{
+    free(block);
+}
+
+void operator delete(void *block, size_t) noexcept
+{
+    free(block);
+}
+
+void operator delete[](void *block, size_t) noexcept
+{
+    free(block);
+}
+#endif

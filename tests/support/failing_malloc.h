@@ -1,0 +1,46 @@
+// Lets one memory allocation fail, and counts what a call leaves allocated. Takes the place of malloc, calloc, realloc
+// and free in the test program, for the library too; under the address sanitizer it stands before the sanitizer's own.
+//
+//     test::EachAllocation faults;
+//     while (faults.Next()) {
+//         ... prepare ...
+//         faults.Arm();
+//         result = TheCall();
+//         faults.Disarm();
+//         if (faults.Fired())
+//             ... the failure: code, nothing changed, faults.LeftAllocated() ...
+//         else
+//             ... success ...
+//     }
+//     EXPECT_EQ(faults.Count(), 1);    how many allocations the call makes
+#ifndef TESTS_SUPPORT_FAILING_MALLOC_H
+#define TESTS_SUPPORT_FAILING_MALLOC_H
+
+namespace test {
+
+// The first allocation fails in the first round, the second in the second, ... until a round needs fewer. A round that
+// prepares anew sees each failure from the same state. One at a time; only the thread that arms it is concerned.
+class EachAllocation {
+  public:
+    EachAllocation() = default;
+    ~EachAllocation() { Disarm(); }
+    EachAllocation(const EachAllocation &) = delete;
+    EachAllocation &operator=(const EachAllocation &) = delete;
+
+    bool Next();  // false when the last round has seen no failure
+    void Arm();
+    void Disarm();
+
+    bool Fired() const { return fired_; }
+    int LeftAllocated() const { return left_allocated_; }  // blocks allocated while armed less blocks freed
+    int Count() const { return round_ - 1; }
+
+  private:
+    int round_ = 0;
+    bool fired_ = true;
+    int left_allocated_ = 0;
+};
+
+}  // namespace test
+
+#endif

@@ -1,0 +1,55 @@
+// A disk or an image file: its size, its sectors, and telling the kernel what has changed.
+#ifndef SFDISK_BLOCK_TARGET_H
+#define SFDISK_BLOCK_TARGET_H
+
+#include "table_entry.h"
+
+#include <stdexcept>
+#include <string>
+
+namespace sfdisk {
+
+// What went wrong, in words for an administrator; the program ends with it.
+class Failure : public std::runtime_error {
+  public:
+    using std::runtime_error::runtime_error;
+};
+
+enum class OpenMode {
+    read,
+    write,
+    write_unused,  // refused while a file system, an array or anything else uses the disk or a partition of it
+};
+
+class BlockTarget {
+  public:
+    // Refuses what is neither a whole disk of 512-byte sectors nor a regular file of at least one.
+    BlockTarget(const std::string &path, OpenMode mode);
+    ~BlockTarget();
+    BlockTarget(const BlockTarget &) = delete;
+    BlockTarget &operator=(const BlockTarget &) = delete;
+
+    const std::string &Path() const { return path_; }
+    uint64_t Sectors() const { return sectors_; }
+
+    Sector Read(uint64_t number) const;
+
+    // In one write, and on the disk when it returns.
+    void Write(uint64_t number, const Sector &sector);
+
+    // Lets the kernel read the table again. While partitions of the disk are in use it refuses that; then it is told of
+    // partition `changed` alone (0: of none). An image file has no partitions.
+    void RereadTable(int changed, const TableEntry &entry);
+
+  private:
+    bool TellPartition(int number, const TableEntry &entry);
+
+    std::string path_;
+    int fd_ = -1;
+    bool is_disk_ = false;
+    uint64_t sectors_ = 0;
+};
+
+}  // namespace sfdisk
+
+#endif
