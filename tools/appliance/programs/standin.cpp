@@ -120,14 +120,14 @@ int main(int argc, char **argv)
         if (!pid_file.empty() && !has("nopid"))
             Write(pid_file, has("garbage") ? "not a number\n" : has("stale") ? "999999\n" : own + "\n");
     };
+    if (kernel_thread)
+        LoseArguments();
     if (!has("late"))
         write_pid_file();
     const int null = ::open("/dev/null", O_RDWR);
     for (int i = 0; i < 3; ++i)
         ::dup2(null, i);
     ::close_range(3, ~0U, 0);
-    if (kernel_thread)
-        LoseArguments();
     if (has("late")) {
         ::usleep(1500000);
         write_pid_file();

@@ -28,6 +28,8 @@ struct Request {
     std::vector<std::string> command;
     Form form = Form::Any;
     bool keep = false;
+    char *arguments = nullptr;  // the memory of our own command line
+    size_t arguments_size = 0;
 };
 
 // One line of the manifest: how one path of the private copy comes into being.
