@@ -3,6 +3,7 @@
 
 #include <gmock/gmock.h>
 
+#include <csignal>
 #include <cstdlib>
 #include <string>
 #include <vector>
@@ -20,7 +21,7 @@ struct Result {
     std::string output;
 };
 
-Result Run(const std::vector<std::string> &words)
+Result RunTool(const std::vector<std::string> &words)
 {
     int pipe[2];
     EXPECT_EQ(::pipe(pipe), 0);
@@ -51,11 +52,11 @@ TEST(Scenario, PlaysWhatWasScriptedWhateverTheArgumentsHold)
     Scenario scenario;
     scenario.Expect(hostile).Prints(std::string("whole\0text", 10)).Exits(3);
     scenario.Expect({"/sbin/vgs", "-o"}).Times(2).Prints("x\n");
-    const Result mdadm = Run(hostile);
+    const Result mdadm = RunTool(hostile);
     EXPECT_EQ(WEXITSTATUS(mdadm.status), 3);
     EXPECT_EQ(mdadm.output, std::string("whole\0text", 10));
-    Run({"/sbin/vgs", "-o"});
-    EXPECT_EQ(Run({"/sbin/vgs", "-o"}).output, "x\n");
+    RunTool({"/sbin/vgs", "-o"});
+    EXPECT_EQ(RunTool({"/sbin/vgs", "-o"}).output, "x\n");
     EXPECT_THAT(Scenario::Calls(),
                 ElementsAre(testing::StartsWith("/sbin/mdadm $'' $'a b' "), "/sbin/vgs -o", "/sbin/vgs -o"));
 }
@@ -74,7 +75,7 @@ TEST(Scenario, DoesNotTakeOneVectorForAnother)
     for (const auto &row : rows) {
         Scenario scenario;
         scenario.Expect(row.expected);
-        EXPECT_EQ(WEXITSTATUS(Run(row.called).status), 97);
+        EXPECT_EQ(WEXITSTATUS(RunTool(row.called).status), 97);
         EXPECT_THAT(scenario.Finish(),
                     testing::AllOf(testing::HasSubstr("not expected: "), testing::HasSubstr("not called: ")));
     }
@@ -89,10 +90,10 @@ TEST(Scenario, KeepsTheOrderUnlessToldOtherwise)
         scenario.ExpectAny("/sbin/route").AnyTimes();
         if (any_order)
             scenario.InAnyOrder();
-        Run({"/sbin/route"});
-        Run({"/sbin/lvm", "2"});
-        Run({"/sbin/route", "add"});
-        Run({"/sbin/lvm", "1"});
+        RunTool({"/sbin/route"});
+        RunTool({"/sbin/lvm", "2"});
+        RunTool({"/sbin/route", "add"});
+        RunTool({"/sbin/lvm", "1"});
         EXPECT_EQ(scenario.Finish() == "", any_order);
     }
 }
@@ -101,7 +102,7 @@ TEST(Scenario, ToolsHaveEffectsAndDieAsTold)
 {
     Scenario scenario;
     scenario.Expect({"/sbin/dhcpcd", "-n", "eth0"}).Runs("#!/bin/sh\necho \"$2\" >/tmp/lease\n").DiesOf(SIGKILL);
-    const Result result = Run({"/sbin/dhcpcd", "-n", "eth0"});
+    const Result result = RunTool({"/sbin/dhcpcd", "-n", "eth0"});
     EXPECT_TRUE(WIFSIGNALED(result.status) && WTERMSIG(result.status) == SIGKILL);
     EXPECT_EQ(WEXITSTATUS(std::system("grep -qx eth0 /tmp/lease")), 0);
 }
