@@ -8,6 +8,7 @@
 #include "tavo_bdb.h"
 #include "tavo_disk.h"
 #include "tavo_error.h"
+#include "tavo_fhost.h"
 #include "tavo_file.h"
 #include "tavo_hash.h"
 #include "tavo_list.h"
