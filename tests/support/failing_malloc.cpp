@@ -5,14 +5,6 @@
 #include <cstddef>
 #include <new>
 
-#if defined(__SANITIZE_ADDRESS__)
-#define TEST_WITH_ASAN 1
-#elif defined(__has_feature)
-#if __has_feature(address_sanitizer)
-#define TEST_WITH_ASAN 1
-#endif
-#endif
-
 #ifdef TEST_WITH_ASAN
 #define REAL(name) __interceptor_##name
 #else
