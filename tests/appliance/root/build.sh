@@ -23,6 +23,19 @@ make
 "$tools/enter" --root "$new" -- /usr/tavo/bin/probe x
 same 'a changed program' 22 $?
 
+# Under chroot alone the programs are shared with the tree: editing one is noticed, and the next build repairs it.
+if [[ $(id -u) -eq 0 ]]; then
+    "$tools/enter" --root "$new" --form chroot -- /bin/sh -c 'echo x >>/usr/tavo/bin/probe' || complain 'a copied file is no matter'
+    for edited in /usr/bin/killall /usr/bin/bash; do
+        message=$("$tools/enter" --root "$new" --form chroot -- /bin/sh -c "echo x >>$edited" 2>&1)
+        same "edited $edited" 125 $?
+        [[ $message == *" changed $new/tree/usr/bin/"* ]] || complain "edited $edited: $message"
+        make
+        "$tools/enter" --root "$new" --form chroot -- true || complain "not repaired: $edited"
+    done
+    cmp "$(command -v bash)" "$new/tree/usr/bin/bash" || complain 'bash is not repaired'
+fi
+
 # Every command that is named by its whole path in the appliance's scripts and tools is there, and no link leads out of
 # the tree: a build that followed one would write to this machine.
 for path in /bin/{sh,mv,cp,rm,touch,cat,grep,echo,kill,ps,ping,busybox} /sbin/{mdadm,sfdisk,ifconfig,route,ip,dhcpcd,lvm,pvcreate,vgs} \

@@ -21,20 +21,6 @@ std::string ReadLink(const std::string &path)
     return {target, static_cast<size_t>(length)};
 }
 
-std::vector<std::string> NamesIn(const std::string &path)
-{
-    DIR *directory = ::opendir(path.c_str());
-    Must(directory, "read", path);
-    std::vector<std::string> names;
-    while (const dirent *found = ::readdir(directory)) {
-        const std::string_view name = found->d_name;
-        if (name != "." && name != "..")
-            names.emplace_back(name);
-    }
-    ::closedir(directory);
-    return names;
-}
-
 void CopyBytes(int in, int out, const std::string &name)
 {
     char buffer[65536];
@@ -49,6 +35,20 @@ void CopyBytes(int in, int out, const std::string &name)
 }
 
 }  // namespace
+
+std::vector<std::string> NamesIn(const std::string &path)
+{
+    DIR *directory = ::opendir(path.c_str());
+    Must(directory, "read", path);
+    std::vector<std::string> names;
+    while (const dirent *found = ::readdir(directory)) {
+        const std::string_view name = found->d_name;
+        if (name != "." && name != "..")
+            names.emplace_back(name);
+    }
+    ::closedir(directory);
+    return names;
+}
 
 void CopyFile(const std::string &from, const std::string &to)
 {

@@ -52,6 +52,7 @@ std::vector<Entry> ReadManifest(const std::string &root);
 void MakeEntry(const Entry &entry, const std::string &tree, const std::string &place);
 void MakeParents(const std::string &place, std::string_view path);
 void MakePlaceFor(const std::string &from, const std::string &to);  // an empty file or directory, as `from` is
+std::vector<std::string> NamesIn(const std::string &path);
 void CopyFile(const std::string &from, const std::string &to);
 void LinkTree(const std::string &from, const std::string &to, const std::string &skip);
 void RemoveTree(const std::string &path);

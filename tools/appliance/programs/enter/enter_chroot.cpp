@@ -33,16 +33,33 @@ void MakeDevices(const std::string &place)
     }
 }
 
+timespec Now()
+{
+    timespec now;
+    ::clock_gettime(CLOCK_REALTIME_COARSE, &now);  // what files are stamped with
+    return now;
+}
+
 // A hard link shares its bytes with the tree. Programs and libraries are replaced, never edited; whoever edits one all
 // the same is told, and the next build makes the tree anew.
-bool IsUntouched(const std::string &tree, time_t since)
+std::string EditedFile(const std::string &path, const timespec &since)
 {
-    for (const char *path : {"/usr/bin/busybox", "/usr/lib/libtavosdk.so.1", "/usr/bin/tavoctl", "/usr/sbin/mdadm"}) {
-        struct stat facts;
-        if (::stat((tree + path).c_str(), &facts) == 0 && facts.st_mtime > since)
-            return false;
+    struct stat facts;
+    if (::lstat(path.c_str(), &facts) != 0)
+        return "";
+    if (S_ISREG(facts.st_mode)) {
+        const timespec &edited = facts.st_mtim;
+        const bool later =
+            edited.tv_sec > since.tv_sec || (edited.tv_sec == since.tv_sec && edited.tv_nsec > since.tv_nsec);
+        return later ? path : "";
     }
-    return true;
+    if (S_ISDIR(facts.st_mode)) {
+        for (const std::string &name : NamesIn(path)) {
+            if (std::string found = EditedFile(path + "/" + name, since); !found.empty())
+                return found;
+        }
+    }
+    return "";
 }
 
 }  // namespace
@@ -70,7 +87,7 @@ int EnterChroot(const Request &request, std::string *why)
         CopyFile(request.emulator, place + "/run/emulator");
 
     ::prctl(PR_SET_CHILD_SUBREAPER, 1, 0, 0, 0);
-    const time_t started = ::time(nullptr);
+    const timespec started = Now();
     const pid_t command = ::fork();
     Must(command >= 0, "start", request.command[0]);
     if (command == 0) {
@@ -87,9 +104,9 @@ int EnterChroot(const Request &request, std::string *why)
         std::fprintf(stderr, "enter: kept %s\n", place.c_str());
     else
         RemoveTree(place);
-    if (!IsUntouched(tree, started)) {
+    if (const std::string edited = EditedFile(tree + "/usr", started); !edited.empty()) {
         ::unlink((request.root + "/key").c_str());
-        Die("the command changed a program of %s in place; build the root again", tree.c_str());
+        Die("the command changed %s in place; build the root again", edited.c_str());
     }
     return status;
 }
