@@ -7,22 +7,32 @@
 #include <new>
 
 namespace tavo {
+namespace {
+
+// What a memory stream has written; freed after the stream is closed.
+struct Memory {
+    Memory() = default;
+    ~Memory() { std::free(text); }
+    Memory(const Memory &) = delete;
+    Memory &operator=(const Memory &) = delete;
+
+    char *text = nullptr;
+    size_t length = 0;
+};
+
+}  // namespace
 
 std::optional<std::string> SectionText(const char *name, const TLIBSZHASH *pairs, const char *format)
 {
-    char *written = nullptr;
-    size_t length = 0;
-    File stream(::open_memstream(&written, &length));
+    Memory memory;
+    const File stream(::open_memstream(&memory.text, &memory.length));
     if (!stream)
         throw std::bad_alloc();
-    const bool accepted = ErrTLIBIFileHash2File(stream.Get(), name, pairs, format) == 0;
-    const bool complete = stream.Close();
-    const HeapBlock<char> text(written);
-    if (!accepted)
+    if (ErrTLIBIFileHash2File(stream.Get(), name, pairs, format) != 0)
         return std::nullopt;
-    if (!complete)
+    if (std::fflush(stream.Get()) != 0)
         throw std::bad_alloc();
-    return std::string(text.get(), length);
+    return std::string(memory.text, memory.length);  // not after the close, which drops a text that it cannot shrink
 }
 
 }  // namespace tavo

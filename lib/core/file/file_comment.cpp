@@ -55,7 +55,13 @@ tavo::Fd CreateScratch()
     return fd;
 }
 
-// By the scratch file, else beside the target as every other rewrite.
+bool OnSameFileSystem(int fd, const std::string &path)
+{
+    struct stat scratch, target;
+    return ::fstat(fd, &scratch) == 0 && ::stat(path.c_str(), &target) == 0 && scratch.st_dev == target.st_dev;
+}
+
+// False when the scratch file cannot serve; then the file is rewritten as every other one.
 bool ReplaceByScratch(tavo::FileRewrite &rewrite, std::string_view text)
 {
     const tavo::Fd lock = CreateScratch();  // held beyond the rename
@@ -63,7 +69,7 @@ bool ReplaceByScratch(tavo::FileRewrite &rewrite, std::string_view text)
         return false;
     tavo::TempFile temp;
     temp.Adopt(tavo::Fd(::fcntl(lock.Get(), F_DUPFD_CLOEXEC, 0)), kScratch);
-    return rewrite.ReplaceBy(temp, text) == 0;
+    return OnSameFileSystem(lock.Get(), rewrite.Target()) && rewrite.ReplaceBy(temp, text) == 0;
 }
 
 }  // namespace

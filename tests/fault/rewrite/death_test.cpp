@@ -1,0 +1,147 @@
+// A process that dies in the middle of a rewrite: the file is the old one or the new one.
+#include "interposed_calls.h"
+#include "support/scratch_dir.h"
+#include "writers.h"
+
+#include <gmock/gmock.h>
+
+#include <csignal>
+#include <random>
+
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+using test::kOldText;
+
+namespace {
+
+int StatusOf(pid_t child)
+{
+    int status = 0;
+    EXPECT_EQ(::waitpid(child, &status, 0), child);
+    return status;
+}
+
+// Runs the writer in a child that dies at its n-th call; true when the child came to its end.
+bool Survives(const test::Writer &writer, const std::string &path, int n)
+{
+    const pid_t child = ::fork();
+    if (child == 0) {
+        test::DieAtCall(n);
+        ::_exit(writer.write(path.c_str()) == 1 ? 0 : 1);
+    }
+    const int status = StatusOf(child);
+    EXPECT_TRUE(WIFEXITED(status) && (WEXITSTATUS(status) == 0 || WEXITSTATUS(status) == test::kDied)) << writer.name;
+    return status == 0;
+}
+
+std::string TextAfter(const test::Writer &writer, const std::string &path)
+{
+    test::WriteFile(path, kOldText, 0640);
+    EXPECT_EQ(writer.write(path.c_str()), 1) << writer.name;
+    return test::ReadFile(path);
+}
+
+TEST(Death, AtEveryCallOfARewriteLeavesTheOldOrTheNewFile)
+{
+    const test::ScratchDir dir;
+    const std::string file = dir / "file";
+    for (const test::Writer &writer : test::kRewriters) {
+        const std::string new_text = TextAfter(writer, file);
+        ASSERT_NE(new_text, kOldText) << writer.name;
+        int n = 0, seen_new = 0;
+        do {
+            test::WriteFile(file, kOldText, 0640);
+            ASSERT_EQ(::chown(file.c_str(), 0, 1), 0);
+            const bool survived = Survives(writer, file, ++n);
+            const std::string text = test::ReadFile(file);
+            EXPECT_TRUE(text == new_text || (text == kOldText && !survived)) << writer.name << " at call " << n;
+            seen_new += text == new_text;
+            struct stat st;
+            ASSERT_EQ(::stat(file.c_str(), &st), 0);
+            EXPECT_EQ(st.st_mode & 07777, 0640u) << writer.name << " at call " << n;
+            EXPECT_EQ(st.st_gid, 1u) << writer.name << " at call " << n;
+            if (survived)
+                break;
+        } while (n < 100);
+        EXPECT_EQ(n, 7) << writer.name << ": write, fchown, fchmod, fsync, rename, fsync of the directory, the end";
+        EXPECT_EQ(seen_new, 2) << writer.name << ": after the rename";
+        // What the dead have left is in nobody's way.
+        EXPECT_EQ(TextAfter(writer, file), new_text) << writer.name;
+    }
+    EXPECT_THAT(dir.Names(), testing::Each(testing::MatchesRegex("file(\\.[A-Za-z0-9]{6})?")));
+}
+
+TEST(Death, AtEveryCallOfAnAppendLeavesTheOldLines)
+{
+    const test::ScratchDir dir;
+    const std::string file = dir / "file";
+    for (const test::Writer &writer : test::kAppenders) {
+        for (int n = 1;; ++n) {
+            ASSERT_LT(n, 100);
+            test::WriteFile(file, kOldText);
+            if (Survives(writer, file, n)) {
+                EXPECT_EQ(n, 3) << writer.name << ": write, fsync, the end";
+                break;
+            }
+            EXPECT_TRUE(test::ReadFile(file).starts_with(kOldText)) << writer.name << " at call " << n;
+            // A torn line ends where the next one begins.
+            EXPECT_EQ(TLIBFileAppendKey(file.c_str(), "next", "1", nullptr), 1) << writer.name;
+            EXPECT_EQ(BlTAVOFileCheckKeyValue(file.c_str(), "next", "1"), 1) << writer.name;
+            EXPECT_EQ(BlTAVOFileCheckKeyValue(file.c_str(), "key", "old"), 1) << writer.name;
+        }
+    }
+}
+
+TEST(Death, AtRandomMomentsLeavesOneOfTheTwoFiles)
+{
+    const test::ScratchDir dir;
+    const std::string file = dir / "file";
+    const std::string old_text = TextAfter(test::kRewriters[0], file);
+    std::string other_text = old_text;
+    other_text.replace(other_text.find("key=new"), 7, "key=" + std::string(300, 'x'));
+    std::mt19937 random(4711);  // the moments differ anyway
+    int seen_old = 0, seen_other = 0;
+    for (int kill = 0; kill < 2000; ++kill) {
+        const pid_t child = ::fork();
+        if (child == 0) {
+            for (const std::string value(300, 'x');;) {
+                TLIBFileSetKeyValue(file.c_str(), "key", value.c_str(), nullptr);
+                TLIBFileSetKeyValue(file.c_str(), "key", "new", nullptr);
+            }
+        }
+        ::usleep(std::uniform_int_distribution<unsigned>(0, 2000)(random));
+        ::kill(child, SIGKILL);
+        StatusOf(child);
+        const std::string text = test::ReadFile(file);
+        ASSERT_TRUE(text == old_text || text == other_text) << "after kill " << kill << ": " << text.size() << " bytes";
+        (text == old_text ? seen_old : seen_other) += 1;
+    }
+    EXPECT_GT(seen_old, 0);
+    EXPECT_GT(seen_other, 0);
+    EXPECT_GT(dir.Names().size(), 50u) << "too few were killed in the middle of it";
+    EXPECT_THAT(dir.Names(), testing::Each(testing::MatchesRegex("file(\\.[A-Za-z0-9]{6})?")));
+}
+
+TEST(Syncs, OneFileAndOneDirectoryHoweverManyKeys)
+{
+    const test::ScratchDir dir;
+    const std::string file = dir / "file";
+    test::Pairs twenty;
+    for (int i = 0; i < 20; ++i)
+        twenty["key" + std::to_string(i)] = "value";
+    const test::StringHash pairs(twenty);
+    test::WriteFile(file, kOldText);
+    test::TakeSyncs();
+    EXPECT_EQ(TLIBFileSetKeyValue(file.c_str(), "key", "new", nullptr), 1);
+    const test::Syncs one = test::TakeSyncs();
+    EXPECT_EQ(TLIBFileSetKeys(file.c_str(), pairs.Get(), nullptr), 1);
+    const test::Syncs many = test::TakeSyncs();
+    EXPECT_EQ(one.files, 1);
+    EXPECT_EQ(one.directories, 1);
+    EXPECT_EQ(many.files, 1);
+    EXPECT_EQ(many.directories, 1);
+}
+
+}  // namespace

@@ -1,0 +1,160 @@
+// Calls that fail and disks that are full: every writer reports its code and leaves the old text, and no other file.
+#include "interposed_calls.h"
+#include "support/captured_log.h"
+#include "support/fault_state.h"
+#include "support/scratch_dir.h"
+#include "writers.h"
+
+#include <gmock/gmock.h>
+
+#include <cerrno>
+
+#include <fcntl.h>
+#include <sys/mount.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+using test::Call;
+using test::Fault;
+using test::kOldText;
+using test::LastFault;
+using testing::ElementsAre;
+
+namespace {
+
+TEST(FailingCalls, GiveTheirCodes)
+{
+    struct Row {
+        Call call;
+        int error, code;
+    };
+    constexpr Row rows[] = {
+        {Call::fstat, EIO, ERR_STAT_FAILED},      {Call::write, EIO, ERR_WRITE_FAILED},
+        {Call::write, ENOSPC, ERR_WRITE_FAILED},  {Call::fsync_file, EIO, ERR_WRITE_FAILED},
+        {Call::fchmod, EPERM, ERR_WRITE_FAILED},  {Call::fchown, EPERM, ERR_WRITE_FAILED},
+        {Call::rename, EBUSY, ERR_RENAME_FAILED},
+    };
+    const test::ScratchDir dir;
+    const std::string file = dir / "file";
+    for (const Row &row : rows) {
+        for (const test::Writer &writer : test::kRewriters) {
+            test::WriteFile(file, kOldText);
+            ASSERT_EQ(::chown(file.c_str(), 0, 1), 0);
+            test::ForgetFault();
+            test::FailCalls(row.call, row.error);
+            EXPECT_EQ(writer.write(file.c_str()), -1) << writer.name;
+            test::FailCalls(Call::none, 0);
+            EXPECT_EQ(LastFault(), (Fault{row.code, writer.module})) << writer.name;
+            EXPECT_EQ(test::ReadFile(file), kOldText) << writer.name;
+            EXPECT_THAT(dir.Names(), ElementsAre("file")) << writer.name;
+        }
+    }
+}
+
+TEST(FailingCalls, OfAnAppendTakeItBack)
+{
+    const test::ScratchDir dir;
+    const std::string file = dir / "file";
+    for (const Call call : {Call::write, Call::fsync_file}) {
+        for (const test::Writer &writer : test::kAppenders) {
+            test::WriteFile(file, kOldText);
+            test::FailCalls(call, EIO);
+            EXPECT_LE(writer.write(file.c_str()), 0) << writer.name;
+            test::FailCalls(Call::none, 0);
+            EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, writer.module}));
+            EXPECT_EQ(test::ReadFile(file), kOldText) << writer.name;
+        }
+    }
+    test::FailCalls(Call::write, EIO);
+    EXPECT_EQ(TLIBFileAppendKey(file.c_str(), "added", "v", nullptr), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, "file_append_key", 82}));
+    EXPECT_EQ(TLIBFileAppendKey((dir / "made").c_str(), "added", "v", nullptr), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, "file_append_key", 66}));
+    test::FailCalls(Call::none, 0);
+    EXPECT_THAT(dir.Names(), ElementsAre("file"));
+}
+
+TEST(FailingCalls, OfTheDirectoryAreOnlyLogged)
+{
+    const test::ScratchDir dir;
+    test::CapturedLog log;
+    for (const test::Writer &writer : test::kRewriters) {
+        const std::string file = dir / writer.name;
+        test::WriteFile(file, kOldText);
+        log.Clear();
+        test::FailCalls(Call::fsync_directory, EIO);
+        EXPECT_EQ(writer.write(file.c_str()), 1) << writer.name << ": the file is the new one already";
+        test::FailCalls(Call::none, 0);
+        EXPECT_THAT(log.Texts(),
+                    ElementsAre(testing::MatchesRegex(writer.module + std::string(":[0-9]+ Failed to sync.*"))));
+    }
+}
+
+// A file system of 64 KiB of its own.
+class FullDisk : public testing::Test {
+  protected:
+    void SetUp() override
+    {
+        if (::mount("tmpfs", dir_.Path().c_str(), "tmpfs", 0, "size=64k") != 0)
+            GTEST_SKIP() << "cannot mount here";
+        mounted_ = true;
+        test::WriteFile(file_, text_);
+    }
+    ~FullDisk() override
+    {
+        if (mounted_)
+            ::umount2(dir_.Path().c_str(), MNT_DETACH);
+    }
+
+    // Leaves this many free pages.
+    void Fill(int pages)
+    {
+        const long page = ::sysconf(_SC_PAGESIZE);
+        const std::string ballast(static_cast<size_t>(page), 'b');
+        const int fd = ::open(ballast_.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0600);
+        off_t size = 0;
+        while (::write(fd, ballast.data(), ballast.size()) == page)
+            size += page;
+        ASSERT_EQ(::ftruncate(fd, size - pages * page), 0);
+        ::close(fd);
+    }
+
+    const test::ScratchDir dir_;
+    const std::string file_ = dir_ / "file", ballast_ = dir_ / "ballast";
+    // Whole pages, so that one more byte needs one more page.
+    const std::string text_ =
+        kOldText + std::string(static_cast<size_t>(::sysconf(_SC_PAGESIZE)) * 2 - kOldText.size() - 1, '#') + "\n";
+    bool mounted_ = false;
+};
+
+TEST_F(FullDisk, FailsEveryWriterAndLeavesTheOldText)
+{
+    for (const int free_pages : {0, 1}) {
+        Fill(free_pages);
+        for (const test::Writer &writer : test::kRewriters) {
+            test::ForgetFault();
+            EXPECT_EQ(writer.write(file_.c_str()), -1) << writer.name;
+            EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, writer.module})) << writer.name;
+            EXPECT_EQ(test::ReadFile(file_), text_) << writer.name;
+            EXPECT_THAT(dir_.Names(), ElementsAre("ballast", "file")) << writer.name;
+        }
+    }
+    ::unlink(ballast_.c_str());
+    EXPECT_EQ(TLIBFileSetKeyValue(file_.c_str(), "key", "new", nullptr), 1) << "with room it works";
+}
+
+TEST_F(FullDisk, TakesBackHalfAnAppend)
+{
+    const std::string value(static_cast<size_t>(::sysconf(_SC_PAGESIZE)) + 100, 'v');
+    for (const int free_pages : {0, 1}) {
+        Fill(free_pages);
+        EXPECT_EQ(TLIBFileAppendKey(file_.c_str(), "added", value.c_str(), nullptr), -1);
+        EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, "file_append_key", 82}));
+        EXPECT_EQ(test::ReadFile(file_), text_);
+        EXPECT_EQ(TLIBFileSetKeyValue((dir_ / "made").c_str(), "added", value.c_str(), nullptr), -1);
+        EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, "file_set_key_value"}));
+        EXPECT_THAT(dir_.Names(), ElementsAre("ballast", "file"));
+    }
+}
+
+}  // namespace

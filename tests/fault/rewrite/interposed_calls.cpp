@@ -1,0 +1,117 @@
+// The calls that a rewrite is made of, in place of the C library's.
+#include "interposed_calls.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <utility>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <sys/syscall.h>
+#include <unistd.h>
+
+namespace test {
+namespace {
+
+int die_at;
+int calls_made;
+Call failing = Call::none;
+int failing_with;
+Syncs syncs;
+
+bool Reached()
+{
+    return ++calls_made == die_at;
+}
+
+// Ends the process or says that the call is to fail.
+bool Fails(Call call)
+{
+    if (Reached())
+        ::_exit(kDied);
+    errno = call == failing ? failing_with : errno;
+    return call == failing;
+}
+
+bool IsDirectory(int fd)
+{
+    struct stat st;
+    return ::fstatat(fd, "", &st, AT_EMPTY_PATH) == 0 && S_ISDIR(st.st_mode);
+}
+
+}  // namespace
+
+void DieAtCall(int n)
+{
+    die_at = n;
+    calls_made = 0;
+}
+
+int CallsMade()
+{
+    return calls_made;
+}
+
+void FailCalls(Call call, int error)
+{
+    failing = call;
+    failing_with = error;
+}
+
+Syncs TakeSyncs()
+{
+    return std::exchange(syncs, {});
+}
+
+}  // namespace test
+
+using test::Call;
+using test::Fails;
+
+extern "C" {
+
+int fstat(int fd, struct stat *st) noexcept
+{
+    if (test::failing == Call::fstat) {
+        errno = test::failing_with;
+        return -1;
+    }
+    return ::fstatat(fd, "", st, AT_EMPTY_PATH);
+}
+
+ssize_t write(int fd, const void *data, size_t size)
+{
+    if (test::Reached()) {
+        [[maybe_unused]] const auto torn = ::syscall(SYS_write, fd, data, size / 2);
+        ::_exit(test::kDied);
+    }
+    if (test::failing == Call::write) {
+        errno = test::failing_with;
+        return -1;
+    }
+    return ::syscall(SYS_write, fd, data, size);
+}
+
+int fsync(int fd)
+{
+    const bool directory = test::IsDirectory(fd);
+    ++(directory ? test::syncs.directories : test::syncs.files);
+    return Fails(directory ? Call::fsync_directory : Call::fsync_file) ? -1
+                                                                       : static_cast<int>(::syscall(SYS_fsync, fd));
+}
+
+int fchmod(int fd, mode_t mode) noexcept
+{
+    return Fails(Call::fchmod) ? -1 : static_cast<int>(::syscall(SYS_fchmod, fd, mode));
+}
+
+int fchown(int fd, uid_t owner, gid_t group) noexcept
+{
+    return Fails(Call::fchown) ? -1 : ::fchownat(fd, "", owner, group, AT_EMPTY_PATH);
+}
+
+int rename(const char *from, const char *to) noexcept
+{
+    return Fails(Call::rename) ? -1 : ::renameat(AT_FDCWD, from, AT_FDCWD, to);
+}
+}

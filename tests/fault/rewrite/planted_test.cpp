@@ -1,0 +1,120 @@
+// What somebody may have put where a rewrite looks: links, FIFOs, devices, directories, foreign files.
+#include "support/fault_state.h"
+#include "support/scratch_dir.h"
+#include "writers.h"
+
+#include <gmock/gmock.h>
+
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+using testing::ElementsAre;
+
+namespace {
+
+constexpr const char *kScratch = "/etc/skel/tempErrTLIBFileComment";
+
+ino_t InodeOf(const std::string &path)
+{
+    struct stat st {};
+    EXPECT_EQ(::lstat(path.c_str(), &st), 0) << path;
+    return st.st_ino;
+}
+
+class Planted : public testing::Test {
+  protected:
+    Planted()
+    {
+        ::mkdir("/etc/skel", 0755);
+        ::unlink(kScratch);
+        test::WriteFile(victim_, "precious\n");
+        test::WriteFile(file_, "a=1\nkey=1\n");
+        ::alarm(20);  // nothing here may wait
+    }
+    ~Planted() override
+    {
+        ::alarm(0);
+        ::unlink(kScratch);
+        ::rmdir(kScratch);
+    }
+
+    // Whatever stands at the scratch name, the key becomes a comment and the victim is as it was.
+    void Comment(const char *what)
+    {
+        test::WriteFile(file_, "a=1\nkey=1\n");
+        EXPECT_EQ(TLIBFileComment(file_.c_str(), "key"), 1) << what;
+        EXPECT_EQ(test::ReadFile(file_), "a=1\n;key=1\n") << what;
+        EXPECT_EQ(test::ReadFile(victim_), "precious\n") << what;
+        EXPECT_THAT(dir_.Names(), ElementsAre("file", "victim")) << what;
+    }
+
+    const test::ScratchDir dir_;
+    const std::string victim_ = dir_ / "victim", file_ = dir_ / "file";
+};
+
+TEST_F(Planted, ForeignThingsAtTheScratchNameStay)
+{
+    const auto stays = [&](const char *what) {
+        const ino_t before = InodeOf(kScratch);
+        Comment(what);
+        EXPECT_EQ(InodeOf(kScratch), before) << what;
+    };
+    ASSERT_EQ(::symlink(victim_.c_str(), kScratch), 0);
+    stays("a link");
+    ASSERT_EQ(::unlink(kScratch), 0);
+    ASSERT_EQ(::mkfifo(kScratch, 0666), 0);
+    stays("a FIFO");
+    ASSERT_EQ(::unlink(kScratch), 0);
+    ASSERT_EQ(::mkdir(kScratch, 0777), 0);
+    stays("a directory");
+    ASSERT_EQ(::rmdir(kScratch), 0);
+    test::WriteFile(kScratch, "foreign");
+    if (::chown(kScratch, 1234, 1234) == 0)
+        stays("another user's file");
+    EXPECT_EQ(test::ReadFile(kScratch), "foreign");
+}
+
+TEST_F(Planted, TheScratchFileOfALivingProcessStays)
+{
+    test::WriteFile(kScratch, "half written");
+    const int fd = ::open(kScratch, O_RDONLY | O_CLOEXEC);
+    ASSERT_EQ(::flock(fd, LOCK_EX), 0);
+    Comment("a living process");
+    EXPECT_EQ(test::ReadFile(kScratch), "half written");
+    ::close(fd);
+    Comment("a dead process");
+    EXPECT_NE(::access(kScratch, F_OK), 0) << "nothing is left where new homes are copied from";
+}
+
+TEST_F(Planted, WhatIsNoFileIsRefusedAtOnce)
+{
+    const std::string fifo = dir_ / "fifo";
+    ASSERT_EQ(::mkfifo(fifo.c_str(), 0666), 0);
+    TLIBSZLIST *list = PslTLIBSzListAlloc(0);
+    test::StringHash hash;
+    for (const std::string &path : {fifo, dir_.Path(), std::string("/dev/zero"), std::string("/dev/full")}) {
+        const char *at = path.c_str();
+        const bool directory = path == dir_.Path();
+        for (const test::Writer &writer : test::kRewriters) {
+            EXPECT_EQ(writer.write(at), -1) << writer.name << " " << path;
+            EXPECT_EQ(test::LastFault(), (test::Fault{ERR_OPEN_FAILED, writer.module})) << path;
+        }
+        for (const test::Writer &writer : test::kAppenders) {
+            EXPECT_LE(writer.write(at), 0) << writer.name << " " << path;
+            const bool key = writer.module == std::string("file_append_key");
+            const int code = directory && key ? ERR_BAD_PARAMETERS : ERR_OPEN_FAILED;
+            EXPECT_EQ(test::LastFault(), (test::Fault{code, writer.module})) << path;
+        }
+        for (const int result : {TLIBFileGetKeyValue(at, "key", nullptr, 0, 0), TLIBFileMatchLineNo(at, "key"),
+                                 TLIBFileGetKeys(at, nullptr, hash.Addr(), "="), TLIBFileReadLines(at, &list),
+                                 TLIBFileGetSection(at, "net", hash.Addr()), TLIBFileEnumSection(at, &list),
+                                 TLIBFileGetLine(at, 1, nullptr, 0), TLIBFileTouch(at)})
+            EXPECT_EQ(result, -1) << path;
+    }
+    TLIBSzListFree(list);
+    EXPECT_THAT(dir_.Names(), ElementsAre("fifo", "file", "victim"));
+}
+
+}  // namespace
