@@ -28,10 +28,10 @@ using test::LastFault;
 
 namespace {
 
-constexpr long kRetry = 50'000'000;  // nanoseconds
+constexpr long long kRetry = 50'000'000;  // nanoseconds
 
 // Sleeps are recorded, not slept; both hooks may change the world or fail.
-std::vector<long> sleeps;
+std::vector<long long> sleeps;
 std::function<bool(timespec *left)> on_sleep;         // false: interrupted
 std::function<bool(int fd, int operation)> on_flock;  // false: errno is the answer
 
@@ -41,7 +41,7 @@ extern "C" {
 
 int nanosleep(const struct timespec *wanted, struct timespec *left)
 {
-    sleeps.push_back(wanted->tv_sec * 1'000'000'000L + wanted->tv_nsec);
+    sleeps.push_back(wanted->tv_sec * 1'000'000'000LL + wanted->tv_nsec);
     return on_sleep && !on_sleep(left) ? -1 : 0;
 }
 
@@ -210,7 +210,7 @@ TEST_F(Lock, TriesAgainTwentyTimesASecond)
         sleeps.clear();
         test::ForgetFault();
         EXPECT_EQ(ErrTLIBFileLock(0x906, row.timeout), -1);
-        EXPECT_EQ(sleeps, std::vector<long>(row.retries, kRetry)) << row.timeout;
+        EXPECT_EQ(sleeps, std::vector<long long>(row.retries, kRetry)) << row.timeout;
         EXPECT_EQ(LastFault(), (Fault{ERR_LOCK_FAILED, "file_lock", 87}));
         EXPECT_EQ(OpenDescriptors(), descriptors);
         EXPECT_EQ(Entry(0x800).pfLock, nullptr) << "all or nothing";
