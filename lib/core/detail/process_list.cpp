@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <charconv>
 #include <memory>
+#include <new>
 
 #include <dirent.h>
 #include <fcntl.h>
@@ -61,7 +62,7 @@ std::vector<Process> ListProcesses()
         return processes;
     const std::unique_ptr<DIR, CloseDirectory> directory(::fdopendir(fd.Get()));
     if (!directory)
-        return processes;
+        throw std::bad_alloc();  // an empty table would say that nobody runs
     const int proc = fd.Release();
     while (const dirent *entry = ::readdir(directory.get())) {
         const std::string name = entry->d_name;

@@ -99,7 +99,10 @@ void AddLines(std::FILE *stream, Search &search)
     ssize_t length;
     while ((length = ::getline(&line, &size, stream)) >= 0)
         search.Add({line, static_cast<size_t>(length)});
+    const bool all = std::feof(stream) != 0;
     std::free(line);
+    if (!all)
+        throw std::bad_alloc();  // half a list would say that some do not run
 }
 
 int FindByPs(const std::string &pattern, pid_t *pids, int capacity)

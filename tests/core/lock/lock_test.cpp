@@ -1,6 +1,7 @@
 // The locks: counting, refusals, time-outs, forked children, and what others may have put in /tmp.
 #include "tavo_lock.h"
 
+#include "support/failing_malloc.h"
 #include "support/fault_state.h"
 
 #include <gtest/gtest.h>
@@ -269,6 +270,25 @@ TEST_F(Lock, RefusesWhatIsNoWayToLock)
         EXPECT_EQ(LastFault(), (Fault{ERR_LOCK_FAILED, "file_lock", 87}));
         EXPECT_EQ(Entry(0x800).pfLock, nullptr);
     }
+}
+
+TEST_F(Lock, OutOfMemoryTakesNothing)
+{
+    const size_t descriptors = OpenDescriptors();
+    test::EachAllocation faults;
+    while (faults.Next()) {
+        faults.Arm();
+        const int result = ErrTLIBFileLock(0x916, 0);
+        if (result == 0)
+            ErrTLIBFileUnlock(0x910);
+        faults.Disarm();
+        EXPECT_EQ(result, faults.Fired() ? -1 : 0);
+        EXPECT_EQ(faults.LeftAllocated(), 0);
+        EXPECT_EQ(OpenDescriptors(), descriptors);
+        if (faults.Fired())
+            EXPECT_EQ(LastFault(), (Fault{ERR_LOCK_FAILED, "file_lock", 87}));
+    }
+    EXPECT_EQ(faults.Count(), 3) << "a stream for each lock";
 }
 
 TEST_F(Lock, UnlockReportsAndStillCloses)

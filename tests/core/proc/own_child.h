@@ -1,0 +1,100 @@
+// Children of a test's own.
+#ifndef TESTS_CORE_PROC_OWN_CHILD_H
+#define TESTS_CORE_PROC_OWN_CHILD_H
+
+#include <cerrno>
+#include <csignal>
+#include <filesystem>
+#include <iterator>
+#include <string>
+#include <vector>
+
+#include <fcntl.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace test {
+
+// Ended and collected when it goes.
+class OwnChild {
+  public:
+    template <class Body>
+    explicit OwnChild(Body body) : pid_(::fork())
+    {
+        if (pid_ == 0) {
+            body();
+            ::_exit(0);
+        }
+    }
+    ~OwnChild()
+    {
+        if (pid_ > 0)
+            ::kill(pid_, SIGKILL);
+        Status();
+    }
+    OwnChild(const OwnChild &) = delete;
+    OwnChild &operator=(const OwnChild &) = delete;
+
+    pid_t Pid() const { return pid_; }
+    int Status()
+    {
+        int status = -1;
+        if (pid_ > 0)
+            ::waitpid(pid_, &status, 0);
+        pid_ = 0;
+        return status;
+    }
+
+  private:
+    pid_t pid_;
+};
+
+// Runs `body` in a process of its own; its result.
+template <class Body>
+int InChild(Body body)
+{
+    OwnChild child([&] { ::_exit(body()); });
+    const int status = child.Status();
+    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+// A process of another user, which waits to be signalled.
+inline void BecomeAndWait(uid_t uid)
+{
+    if (::setresuid(uid, uid, uid) != 0)
+        ::_exit(1);
+    for (;;)
+        ::pause();
+}
+
+// The action of SIGCHLD for a scope.
+class ChildAction {
+  public:
+    ChildAction(void (*handler)(int), int flags)
+    {
+        struct sigaction action = {};
+        action.sa_handler = handler;
+        action.sa_flags = flags;
+        ::sigaction(SIGCHLD, &action, &saved_);
+    }
+    ~ChildAction() { ::sigaction(SIGCHLD, &saved_, nullptr); }
+    ChildAction(const ChildAction &) = delete;
+    ChildAction &operator=(const ChildAction &) = delete;
+
+  private:
+    struct sigaction saved_;
+};
+
+inline bool HasNoChildren()
+{
+    return ::waitpid(-1, nullptr, WNOHANG) == -1 && errno == ECHILD;
+}
+
+inline auto OpenDescriptors()
+{
+    return std::distance(std::filesystem::directory_iterator("/proc/self/fd"), std::filesystem::directory_iterator());
+}
+
+}  // namespace test
+
+#endif

@@ -1,0 +1,266 @@
+// Pid files, and signals to the processes that they name.
+#include "tavo_proc.h"
+
+#include "own_child.h"
+#include "support/failing_malloc.h"
+#include "support/fault_state.h"
+#include "support/scratch_dir.h"
+
+#include <gtest/gtest.h>
+
+#include <climits>
+#include <string>
+#include <vector>
+
+#include <sys/stat.h>
+
+using test::Fault;
+using test::LastFault;
+
+namespace {
+
+constexpr uid_t kSomebody = 1000;
+
+std::string Number(long number)
+{
+    return std::to_string(number) + "\n";
+}
+
+TEST(PidFile, WhatIsANumber)
+{
+    const std::string own = std::to_string(::getpid());
+    const struct {
+        std::string text;
+        pid_t pid;
+    } rows[] = {{own + "\n", ::getpid()},
+                {own, ::getpid()},
+                {"   " + own + " \r\n", ::getpid()},
+                {own + "\nwhatever follows\n", ::getpid()},
+                {"1\n", 1},
+                {"", 0},
+                {"\n" + own + "\n", 0},
+                {"0\n", 0},
+                {"-1\n", 0},
+                {"+1\n", 0},
+                {"-" + own + "\n", 0},
+                {"4294967295\n", 0},
+                {"4294967297\n", 0},
+                {"4194305\n", 0},
+                {"18446744073709551617\n", 0},
+                {std::string(300, '9'), 0},
+                {std::string(300, ' ') + own, 0},
+                {"smbd\n", 0},
+                {own + "x\n", 0},
+                {own + " 1\n", 0},
+                {"0x1\n", 0},
+                {own + std::string("\0\n", 2), 0}};
+    const test::ScratchDir dir;
+    const std::string path = dir / "x.pid";
+    for (const auto &row : rows) {
+        test::WriteFile(path, row.text);
+        test::ForgetFault();
+        EXPECT_EQ(TLIBReadPidFile(path.c_str()), row.pid) << row.text;
+        EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS) << row.text;
+        EXPECT_EQ(TLIBProcSignalByPidFile(path.c_str(), 0), row.pid > 0 ? 0 : -1) << row.text;
+        EXPECT_EQ(LastFault(), (row.pid > 0 ? Fault{} : Fault{ERR_OPEN_FAILED, "proc_signal_by_pid_file"})) << row.text;
+        EXPECT_EQ(TLIBProcAliveByPidFile(path.c_str()), row.pid > 0) << row.text;
+    }
+}
+
+TEST(PidFile, Refusals)
+{
+    const test::ScratchDir dir;
+    const std::string path = dir / "x.pid";
+    test::WriteFile(path, Number(::getpid()));
+    ASSERT_EQ(::mkfifo((dir / "fifo").c_str(), 0666), 0);
+    const std::string fifo = dir / "fifo", absent = dir / "absent";
+    const Fault no_file = {ERR_OPEN_FAILED, "read_pid_file"};
+    const struct {
+        const char *path;
+        Fault fault;
+    } reads[] = {{nullptr, {ERR_BAD_PARAMETERS, "read_pid_file"}},
+                 {absent.c_str(), no_file},
+                 {fifo.c_str(), no_file},
+                 {dir.Path().c_str(), no_file}};
+    for (const auto &row : reads) {
+        EXPECT_EQ(TLIBReadPidFile(row.path), -1);
+        EXPECT_EQ(LastFault(), row.fault);
+        EXPECT_EQ(TLIBProcAliveByPidFile(row.path), 0);
+    }
+
+    test::OwnChild gone([] {});
+    const std::string dead = dir / "dead.pid";
+    test::WriteFile(dead, Number(gone.Pid()));
+    gone.Status();
+    const auto fault = [](int code) {
+        return Fault{code, "proc_signal_by_pid_file"};
+    };
+    const struct {
+        const char *path;
+        int signal;
+        Fault fault;
+    } signals[] = {{nullptr, 0, fault(ERR_BAD_PARAMETERS)},     {path.c_str(), -1, fault(ERR_BAD_PARAMETERS)},
+                   {absent.c_str(), 0, fault(ERR_OPEN_FAILED)}, {fifo.c_str(), 0, fault(ERR_OPEN_FAILED)},
+                   {dead.c_str(), 0, fault(ERR_SYS_UNKNOWN)},   {path.c_str(), 1000, fault(ERR_SYS_UNKNOWN)}};
+    for (const auto &row : signals) {
+        EXPECT_EQ(TLIBProcSignalByPidFile(row.path, row.signal), -1);
+        EXPECT_EQ(LastFault(), row.fault);
+    }
+}
+
+// Root signals for others, so a file that somebody else could have written speaks for that somebody's processes only.
+TEST(PidFile, ForeignFilesSpeakForTheirOwnersProcesses)
+{
+    test::OwnChild victim([] { ::pause(); });
+    test::OwnChild theirs([] { test::BecomeAndWait(kSomebody); });
+    test::OwnChild gone([] {});
+    const pid_t dead = gone.Pid();
+    gone.Status();
+    struct stat st;
+    for (int i = 0; i < 1000 && (::stat(("/proc/" + std::to_string(theirs.Pid())).c_str(), &st) != 0 || st.st_uid == 0);
+         ++i)
+        ::usleep(1000);
+
+    const test::ScratchDir dir;
+    const std::string path = dir / "x.pid";
+    const struct {
+        pid_t pid;
+        pid_t read;
+        int code;
+    } rows[] = {{victim.Pid(), 0, ERR_OPEN_FAILED},
+                {1, 0, ERR_OPEN_FAILED},
+                {dead, dead, ERR_SYS_UNKNOWN},
+                {theirs.Pid(), theirs.Pid(), 0}};
+    for (const auto &row : rows) {
+        test::WriteFile(path, Number(row.pid));
+        ASSERT_EQ(::chown(path.c_str(), kSomebody, 0), 0);
+        test::ForgetFault();
+        EXPECT_EQ(TLIBReadPidFile(path.c_str()), row.read);
+        EXPECT_EQ(TLIBProcSignalByPidFile(path.c_str(), 0), row.code ? -1 : 0);
+        EXPECT_EQ(TLIBErrGet(), row.code);
+    }
+    ASSERT_EQ(::chown(path.c_str(), 0, 0), 0);
+    EXPECT_EQ(TLIBProcSignalByPidFile(path.c_str(), SIGTERM), 0);
+    EXPECT_EQ(theirs.Status(), SIGTERM);
+
+    test::WriteFile(path, Number(victim.Pid()));
+    const std::string link = dir / "link";
+    ASSERT_EQ(::symlink(path.c_str(), link.c_str()), 0);
+    EXPECT_EQ(TLIBProcSignalByPidFile(link.c_str(), SIGTERM), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_OPEN_FAILED);
+    EXPECT_EQ(::waitpid(victim.Pid(), nullptr, WNOHANG), 0) << "the victim lives";
+}
+
+TEST(PidFile, Create)
+{
+    const test::ScratchDir dir;
+    const std::string path = dir / "x.pid";
+    test::WriteFile(path, "an older and longer text\n", 0600);
+    EXPECT_EQ(TAVOProcPidFileCreate(path.c_str()), 0);
+    EXPECT_EQ(test::ReadFile(path), Number(::getpid()));
+    EXPECT_EQ(TLIBReadPidFile(path.c_str()), ::getpid());
+    const std::string link = dir / "link";
+    ASSERT_EQ(::symlink(path.c_str(), link.c_str()), 0);
+    EXPECT_EQ(TAVOProcPidFileCreate(link.c_str()), 0) << "the administrator's own link";
+
+    const Fault cannot = {ERR_OPEN_FAILED, "proc_pid_file_create"};
+    const std::string below_file = path + "/x";
+    const struct {
+        const char *path;
+        Fault fault;
+    } rows[] = {{nullptr, {ERR_BAD_PARAMETERS, "proc_pid_file_create"}},
+                {below_file.c_str(), cannot},
+                {dir.Path().c_str(), cannot},
+                {"/dev/full", cannot}};
+    for (const auto &row : rows) {
+        EXPECT_EQ(TAVOProcPidFileCreate(row.path), -1);
+        EXPECT_EQ(LastFault(), row.fault);
+    }
+}
+
+TEST(PidFile, CreateOutOfMemory)
+{
+    const test::ScratchDir dir;
+    const std::string path = dir / "a name that is longer than what a string keeps within itself.pid";
+    test::EachAllocation faults;
+    while (faults.Next()) {
+        faults.Arm();
+        const int result = TAVOProcPidFileCreate(path.c_str());
+        faults.Disarm();
+        EXPECT_EQ(result, faults.Fired() ? -1 : 0);
+        EXPECT_EQ(faults.LeftAllocated(), 0);
+        if (faults.Fired())
+            EXPECT_EQ(LastFault(), (Fault{ERR_OUT_OF_MEMORY, "proc_pid_file_create"}));
+    }
+    EXPECT_GE(faults.Count(), 1);
+}
+
+TEST(PidFile, CreateAmongTraps)
+{
+    const test::ScratchDir dir;
+    const std::string open_dir = dir / "open";
+    ASSERT_EQ(::mkdir(open_dir.c_str(), 0777), 0);
+    ASSERT_EQ(::chmod(open_dir.c_str(), 01777), 0);
+    const std::string victim = dir / "victim", link = open_dir + "/link", hard = open_dir + "/hard",
+                      fifo = open_dir + "/fifo", foreign = open_dir + "/foreign", mine = open_dir + "/mine";
+    test::WriteFile(victim, "kept");
+    test::WriteFile(foreign, "kept");
+    ASSERT_EQ(::chown(foreign.c_str(), kSomebody, 0), 0);
+    ASSERT_EQ(::symlink(victim.c_str(), link.c_str()), 0);
+    ASSERT_EQ(::link(victim.c_str(), hard.c_str()), 0);
+    ASSERT_EQ(::mkfifo(fifo.c_str(), 0666), 0);
+    for (const std::string &path : {link, hard, fifo, foreign}) {
+        test::ForgetFault();
+        EXPECT_EQ(TAVOProcPidFileCreate(path.c_str()), -1) << path;
+        EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "proc_pid_file_create"})) << path;
+    }
+    EXPECT_EQ(test::ReadFile(victim), "kept");
+    EXPECT_EQ(test::ReadFile(foreign), "kept");
+    for (int i = 0; i < 2; ++i)
+        EXPECT_EQ(TAVOProcPidFileCreate(mine.c_str()), 0);
+    EXPECT_EQ(test::ReadFile(mine), Number(::getpid()));
+}
+
+TEST(ProcAlive, AsksAboutOneProcess)
+{
+    test::OwnChild theirs([] { test::BecomeAndWait(kSomebody); });
+    test::OwnChild gone([] {});
+    const pid_t dead = gone.Pid();
+    gone.Status();
+    test::ForgetFault();
+    EXPECT_EQ(BlTLIBProcAlive(::getpid()), 1);
+    EXPECT_EQ(BlTLIBProcAlive(theirs.Pid()), 1);
+    for (const pid_t pid : {dead, 0, -1, -::getpgrp(), INT_MIN, INT_MAX})
+        EXPECT_EQ(BlTLIBProcAlive(pid), 0) << pid;
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    const pid_t root = ::getpid();
+    EXPECT_EQ(
+        test::InChild([&] { return ::setresuid(kSomebody, kSomebody, kSomebody) == 0 ? BlTLIBProcAlive(root) : 9; }), 1)
+        << "of another user, and not to be signalled";
+}
+
+TEST(SysRemove, FilesOnly)
+{
+    const test::ScratchDir dir;
+    const std::string file = dir / "file", link = dir / "link", absent = dir / "absent", below = file + "/x";
+    test::WriteFile(file, "x");
+    ASSERT_EQ(::symlink(file.c_str(), link.c_str()), 0);
+    EXPECT_EQ(TLIBSysRemove(link.c_str()), 0);
+    EXPECT_EQ(dir.Names(), std::vector<std::string>{"file"});
+    const struct {
+        const char *path;
+        int code;
+    } rows[] = {{nullptr, ERR_BAD_PARAMETERS},
+                {absent.c_str(), ERR_FILE_NOT_FOUND},
+                {dir.Path().c_str(), ERR_SYS_UNKNOWN},
+                {below.c_str(), ERR_SYS_UNKNOWN},
+                {"/proc/self/stat", ERR_ACCESS_DENIED}};
+    for (const auto &row : rows) {
+        EXPECT_EQ(TLIBSysRemove(row.path), -1);
+        EXPECT_EQ(LastFault(), (Fault{row.code, "sys_remove"}));
+    }
+    EXPECT_EQ(TLIBSysRemove(file.c_str()), 0);
+    EXPECT_TRUE(dir.Names().empty());
+}
+
+}  // namespace

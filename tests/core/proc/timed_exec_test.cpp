@@ -1,0 +1,235 @@
+// Running programs for a limited time.
+#include "tavo_proc.h"
+
+#include "own_child.h"
+#include "support/captured_log.h"
+#include "support/fault_state.h"
+#include "support/scratch_dir.h"
+
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <climits>
+#include <functional>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include <sys/resource.h>
+#include <sys/stat.h>
+#include <syslog.h>
+
+using test::ChildAction;
+using test::Fault;
+using test::LastFault;
+using namespace std::chrono_literals;
+
+namespace {
+
+const Fault kExpired = {ERR_TIMER_EXPIRED, "proc_timed_exec"};
+
+std::chrono::milliseconds TimeOf(const std::function<void()> &what)
+{
+    const auto start = std::chrono::steady_clock::now();
+    what();
+    return std::chrono::duration_cast<std::chrono::milliseconds>(std::chrono::steady_clock::now() - start);
+}
+
+void HaveChildrenDie()
+{
+    for (int i = 0; i < 40; ++i) {
+        if (::fork() == 0) {
+            ::usleep(static_cast<useconds_t>(i) * 40000);
+            ::_exit(1);
+        }
+    }
+}
+
+void BlockChildSignal()
+{
+    sigset_t mask;
+    sigemptyset(&mask);
+    sigaddset(&mask, SIGCHLD);
+    ::sigprocmask(SIG_BLOCK, &mask, nullptr);
+}
+
+TEST(TimedExec, Refuses)
+{
+    test::CapturedLog log;
+    const struct {
+        int seconds;
+        const char *program;
+        const char *name;
+    } rows[] = {
+        {0, "/bin/true", "cSeconds"}, {-1, "/bin/true", "cSeconds"}, {5, nullptr, "szProgram"}, {5, "", "szProgram"}};
+    for (const auto &row : rows) {
+        log.Clear();
+        test::ForgetFault();
+        EXPECT_EQ(TLIBTimedExec(row.seconds, row.program, NULL), -1);
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "proc_timed_exec"}));
+        ASSERT_EQ(log.Lines().size(), 1u);
+        EXPECT_EQ(log.Lines()[0].priority, LOG_ERR);
+        EXPECT_THAT(log.Lines()[0].text, testing::MatchesRegex("proc_timed_exec:[0-9]+ Invaild Argument \\(" +
+                                                               std::string(row.name) + "\\)=\\[(0|-1)\\]\n"));
+    }
+}
+
+TEST(TimedExec, StatusIsTheResult)
+{
+    test::ForgetFault();
+    EXPECT_EQ(TLIBTimedExec(60, "/bin/sh", "-c", "exit 3", NULL), 3);
+    EXPECT_EQ(TLIBTimedExec(60, "/nonexistent", NULL), 255);
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    EXPECT_EQ(TLIBTimedExec(60, "/bin/sh", "-c", "kill -KILL $$", NULL), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_OP_FAILURE, "proc_timed_exec"}));
+    EXPECT_EQ(TLIBTimedExec(INT_MAX, "/bin/true", NULL), 0);
+    EXPECT_EQ(TLIBTimedExec(60, "/bin/sh", "-c", "exit $#", "0", "1", "2", "3", "4", "5", "6", "7", "8", "9", "10",
+                            "11", "12", "13", "14", "15", "16", "17", "18", "19", "20", "21", "22", "23", "24", "25",
+                            "26", "27", "not", "these", NULL),
+              27);
+}
+
+// A tenth of a second before the limit a program has made it, a tenth after it has not, whatever else dies meanwhile and
+// however the caller stands to its children. All at the same time, each in a process of its own.
+TEST(TimedExec, TheLimitIsExact)
+{
+    const struct {
+        const char *what;
+        std::function<void()> prepare;
+    } surroundings[] = {
+        {"plain",
+         [] {
+         }},
+        {"other children die", HaveChildrenDie},
+        {"SIGCHLD ignored",
+         [] {
+             ::signal(SIGCHLD, SIG_IGN);
+         }},
+        {"SIGCHLD ignored, others die",
+         [] {
+             ::signal(SIGCHLD, SIG_IGN);
+             HaveChildrenDie();
+         }},
+        {"SIGCHLD blocked", BlockChildSignal},
+        {"called before",
+         [] {
+             TLIBTimedExec(9, "/bin/true", NULL);
+             HaveChildrenDie();
+         }},
+    };
+    struct Case {
+        const char *program;  // how long it takes
+        int result;
+        std::chrono::milliseconds earliest;
+        std::chrono::milliseconds latest;
+    };
+    const Case cases[] = {{"0.9", 0, 890ms, 1000ms}, {"1.1", -1, 1000ms, 1095ms}};
+    const auto is_right = [](const Case &one) {
+        test::ForgetFault();
+        int result = -2;
+        const auto time = TimeOf([&] { result = TLIBTimedExec(1, "/bin/sleep", one.program, NULL); });
+        return result == one.result && LastFault() == (result == -1 ? kExpired : Fault{}) && time >= one.earliest &&
+               time <= one.latest;
+    };
+    struct Run {
+        std::string what;
+        std::unique_ptr<test::OwnChild> child;
+    };
+    std::vector<Run> runs;
+    for (const auto &row : surroundings) {
+        for (const Case &one : cases) {
+            runs.push_back({row.what + std::string(": ") + one.program, std::make_unique<test::OwnChild>([&] {
+                                row.prepare();
+                                // A loaded machine may be late once, not three times.
+                                ::_exit(is_right(one) || is_right(one) || is_right(one) ? 0 : 1);
+                            })});
+        }
+    }
+    for (Run &run : runs)
+        EXPECT_EQ(run.child->Status(), 0) << run.what;
+}
+
+TEST(TimedExec, KillsWhatTheProgramHasStartedAndLeavesNoZombie)
+{
+    const test::ScratchDir dir;
+    const std::string out = dir / "pid";
+    EXPECT_EQ(
+        TLIBTimedExec(1, "/bin/sh", "-c", "trap '' TERM; sleep 60 & echo $! > $0; wait; sleep 60", out.c_str(), NULL),
+        -1);
+    EXPECT_EQ(LastFault(), kExpired);
+    EXPECT_TRUE(test::HasNoChildren());
+    const pid_t grandchild = std::stoi(test::ReadFile(out));
+    for (int i = 0; i < 100 && BlTLIBProcAlive(grandchild); ++i) {
+        const std::string stat = "/proc/" + std::to_string(grandchild) + "/stat";
+        if (::access(stat.c_str(), R_OK) == 0 && test::ReadFile(stat).find(") Z ") != std::string::npos)
+            break;  // dead, and its new parent takes its time
+        ::usleep(10000);
+        ASSERT_LT(i, 99) << "the program's own child lives on";
+    }
+}
+
+TEST(TimedExec, TheHandlerStaysAndAnIgnoringCallerGetsNoZombies)
+{
+    EXPECT_EQ(test::InChild([] {
+                  ::signal(SIGCHLD, SIG_IGN);
+                  TLIBTimedExec(9, "/bin/true", NULL);
+                  struct sigaction left;
+                  ::sigaction(SIGCHLD, nullptr, &left);
+                  if (left.sa_handler == SIG_IGN || left.sa_handler == SIG_DFL || !(left.sa_flags & SA_NOCLDWAIT))
+                      return 1;
+                  if (::fork() == 0)
+                      ::_exit(0);
+                  ::usleep(50000);
+                  return test::HasNoChildren() ? 0 : 2;
+              }),
+              0);
+}
+
+// The pipe is one a process: a forked child must not take its parent's rings, and after a daemon has closed all its
+// descriptors the numbers belong to other files.
+TEST(TimedExec, ThePipeIsTheProcessesOwn)
+{
+    TLIBTimedExec(9, "/bin/true", NULL);
+    test::OwnChild other([] { ::_exit(TLIBTimedExec(9, "/bin/sh", "-c", "sleep 0.3; exit 7", NULL)); });
+    int result = -2;
+    EXPECT_LT(TimeOf([&] { result = TLIBTimedExec(9, "/bin/sh", "-c", "sleep 0.3; exit 8", NULL); }), 2s);
+    EXPECT_EQ(result, 8);
+    EXPECT_EQ(other.Status(), 7 << 8);
+
+    const test::ScratchDir dir;
+    const std::string path = dir / "file";
+    EXPECT_EQ(test::InChild([&] {
+                  TLIBTimedExec(9, "/bin/true", NULL);
+                  for (int fd = 3; fd < 64; ++fd)
+                      ::close(fd);
+                  for (int fd = 3; fd < 16; ++fd) {
+                      if (::open(path.c_str(), O_RDWR | O_CREAT, 0600) != fd)
+                          return 1;
+                  }
+                  if (::fork() == 0)
+                      ::_exit(0);
+                  ::waitpid(-1, nullptr, 0);
+                  return TLIBTimedExec(9, "/bin/sh", "-c", "exit 6", NULL) == 6 && ::close(3) == 0 && ::close(15) == 0
+                             ? 0
+                             : 2;
+              }),
+              0);
+    EXPECT_EQ(test::ReadFile(path), "");
+}
+
+TEST(TimedExec, AbortsWithoutDescriptorsForThePipe)
+{
+    test::OwnChild child([] {
+        const struct rlimit few = {3, 3};
+        const struct rlimit no_core = {0, 0};
+        ::setrlimit(RLIMIT_CORE, &no_core);
+        for (int fd = 3; fd < 64; ++fd)
+            ::close(fd);
+        ::setrlimit(RLIMIT_NOFILE, &few);
+        TLIBTimedExec(9, "/bin/true", NULL);
+    });
+    const int status = child.Status();
+    EXPECT_TRUE(WIFSIGNALED(status) && WTERMSIG(status) == SIGABRT) << status;
+}
+
+}  // namespace
