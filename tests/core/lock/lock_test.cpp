@@ -285,8 +285,9 @@ TEST_F(Lock, OutOfMemoryTakesNothing)
         EXPECT_EQ(result, faults.Fired() ? -1 : 0);
         EXPECT_EQ(faults.LeftAllocated(), 0);
         EXPECT_EQ(OpenDescriptors(), descriptors);
-        if (faults.Fired())
+        if (faults.Fired()) {
             EXPECT_EQ(LastFault(), (Fault{ERR_LOCK_FAILED, "file_lock", 87}));
+        }
     }
     EXPECT_EQ(faults.Count(), 3) << "a stream for each lock";
 }

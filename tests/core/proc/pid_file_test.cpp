@@ -189,8 +189,9 @@ TEST(PidFile, CreateOutOfMemory)
         faults.Disarm();
         EXPECT_EQ(result, faults.Fired() ? -1 : 0);
         EXPECT_EQ(faults.LeftAllocated(), 0);
-        if (faults.Fired())
+        if (faults.Fired()) {
             EXPECT_EQ(LastFault(), (Fault{ERR_OUT_OF_MEMORY, "proc_pid_file_create"}));
+        }
     }
     EXPECT_GE(faults.Count(), 1);
 }
