@@ -19,11 +19,10 @@ print(*[subprocess.run(sys.argv[2:] + [end], stderr=subprocess.DEVNULL).returnco
     same "$form: no descriptor of the caller" '' "$(inside 'ls /proc/self/fd 2>/dev/null' 7</etc/passwd | grep -x 7)"
 
     # Daemons that left the session, ignore signals or still hold the output: all gone when enter comes back.
-    name=leftover$$$form
-    inside "cp /bin/busybox /tmp/$name; ln -s /tmp/$name /tmp/sleep
-        (trap '' TERM HUP; setsid /tmp/sleep 1234567 </dev/null >/dev/null 2>&1 &)
-        setsid /tmp/sleep 1234567 & exit 0"
-    same "$form: left processes" '' "$(pgrep -f '^/tmp/sleep 1234567')"
+    inside "ln -s /bin/busybox /tmp/sleep
+        (trap '' TERM HUP; setsid /tmp/sleep 1$$ </dev/null >/dev/null 2>&1 &)
+        setsid /tmp/sleep 1$$ & exit 0"
+    same "$form: left processes" '' "$(pgrep -f "^/tmp/sleep 1$$\$")"
 
     # A signal to enter goes to the command, which may take its time and choose its status.
     rm -f "$scratch/pid"
@@ -35,12 +34,12 @@ print(*[subprocess.run(sys.argv[2:] + [end], stderr=subprocess.DEVNULL).returnco
 done
 
 # Killed itself, it takes everything with it.
-$enter -- /bin/sh -c 'cp /bin/busybox /tmp/b; ln -s /tmp/b /tmp/sleep; echo; /tmp/sleep 7654321' 2>/dev/null >"$scratch/started" &
+$enter -- /bin/sh -c 'ln -s /bin/busybox /tmp/sleep; echo; /tmp/sleep 2'$$ 2>/dev/null >"$scratch/started" &
 while [[ ! -s $scratch/started ]]; do sleep 0.02; done
 kill -KILL $!
 wait $! 2>/dev/null
 sleep 0.3
-same 'after a kill' '' "$(pgrep -f '^/tmp/sleep 7654321')"
+same 'after a kill' '' "$(pgrep -f "^/tmp/sleep 2$$\$")"
 
 same 'no root there' 125 "$(outcome "$root/bin/enter" --root "$scratch" -- true)"
 same 'a folder that is not there' 125 "$(outcome $enter --bind /no/such/folder -- true)"
