@@ -1,0 +1,24 @@
+// The exit statuses of tavoctl. Scripts rely on them.
+#ifndef TAVOCTL_EXIT_STATUS_H
+#define TAVOCTL_EXIT_STATUS_H
+
+namespace tavoctl {
+
+enum ExitStatus : int {
+    exit_done = 0,
+    exit_failed = 1,
+    exit_usage = 2,      // a wrong command line, or an argument that the library refuses
+    exit_not_found = 3,  // what was asked for is not there
+    exit_busy = 4,       // somebody else holds a lock or a device
+};
+
+// What `lock run` gives for a program that it could not run, as shells do.
+enum ProgramStatus : int {
+    exit_cannot_execute = 126,
+    exit_no_such_program = 127,
+    exit_by_signal = 128,  // plus the number of the signal that ended the program
+};
+
+}  // namespace tavoctl
+
+#endif

@@ -1,0 +1,24 @@
+// The families of commands. A new one is a file of its own, named like the family, and a line in each list here.
+#ifndef TAVOCTL_FAMILIES_H
+#define TAVOCTL_FAMILIES_H
+
+namespace tavoctl {
+
+class Program;
+using AddFamily = void(Program &);
+
+AddFamily AddConf;
+AddFamily AddSection;
+AddFamily AddLock;
+AddFamily AddProc;
+AddFamily AddError;
+AddFamily AddVersion;
+
+// In the order of the help text.
+inline constexpr AddFamily *families[] = {
+    AddConf, AddSection, AddLock, AddProc, AddError, AddVersion,
+};
+
+}  // namespace tavoctl
+
+#endif
