@@ -8,6 +8,8 @@
 #define TAVO_APPLIANCE_H
 
 #include "tavo_error.h"
+#include "tavo_hash.h"
+#include "tavo_list.h"
 
 TAVO_BEGIN_DECLS
 
@@ -41,6 +43,29 @@ TAVO_API int TAVOEBoxIsPoweron(const TAVOEBOX *pBox);
 
 /* The largest size of an array member that the model uses, "raidsizelimit", in KiB; 0 without a limit. */
 TAVO_API unsigned long RAIDSizeLimitGet(void);
+
+/* --- accounts --- */
+
+/* Renames and removes users and groups in the user lists of Samba's settings, /usr/tavo/etc/smb.conf: "valid users",
+ * "invalid users", "read list", "write list" and "admin users" of every section. pshNames maps upper-case old names to
+ * new names, "" removing the name; a key that begins with "@" is a group, which stands in the file as "@name" or
+ * "+name". Everything else in the file stays as it is, byte for byte. Hold the Samba lock.
+ * Returns 0 also when there is no such file, or -1 with
+ *   ERR_BAD_PARAMETERS  pshNames is NULL
+ *   ERR_OPEN_FAILED, ERR_READ_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED  the file, which is as it was */
+TAVO_API int TAVOUserModifySmbConf(const TLIBSZHASH *pshNames);
+
+/* Appends the domain accounts that are recorded as in use, the lines of /usr/tavo/etc/duser_used that hold a backslash.
+ * Returns how many; -1 with ERR_BAD_PARAMETERS (ppList or *ppList is NULL), ERR_READ_FAILED, or the list's code. */
+TAVO_API int TAVOPushDUserUsed(TLIBSZLIST **ppList);
+
+/* Sends the signal to the appliance's event daemon, by /var/run/scemd.pid; 47 tells it that accounts have changed.
+ * Returns 0 also when no such daemon runs, or -1 with ERR_SYS_UNKNOWN. */
+TAVO_API int TLIBScemdNotify(int signal);
+
+/* Sends the signal to the download scheduler, by /var/run/scheduler.pid; 10 has it read the accounts again. As
+ * TLIBScemdNotify. */
+TAVO_API int TAVOSchedulerHup(int signal);
 
 TAVO_END_DECLS
 

@@ -10,13 +10,16 @@
 #include "tavo_error.h"
 #include "tavo_fhost.h"
 #include "tavo_file.h"
+#include "tavo_group.h"
 #include "tavo_hash.h"
 #include "tavo_list.h"
 #include "tavo_lock.h"
 #include "tavo_net.h"
 #include "tavo_partition.h"
 #include "tavo_proc.h"
+#include "tavo_quota.h"
 #include "tavo_section.h"
 #include "tavo_str.h"
+#include "tavo_user.h"
 
 #endif

@@ -1,0 +1,32 @@
+// Names of users and groups: which are acceptable, and the key that one has in the stores.
+#ifndef TAVO_ACCOUNT_DETAIL_ACCOUNT_NAME_H
+#define TAVO_ACCOUNT_DETAIL_ACCOUNT_NAME_H
+
+#include <optional>
+#include <string>
+#include <string_view>
+
+namespace tavo {
+
+inline constexpr int kUserNameChars = 64;
+inline constexpr int kGroupNameChars = 15;
+
+// Upper-casing can make a character three times as long, and a name has at most 64 of up to four bytes.
+inline constexpr size_t kUserKeySize = 492;
+inline constexpr size_t kGroupKeySize = 128;
+
+// The rule that users and groups share; they differ in the greatest number of characters only.
+bool IsAccountName(const char *name, int max_chars);
+
+// "." and ".." pass that rule, but no folder of that name can be somebody's home.
+bool IsDotName(std::string_view name);
+
+bool IsDomainName(std::string_view name);  // holds a backslash
+
+// The upper-case name with its NUL, as the stores have it. Empty when the name is no UTF-8 or too long for the buffer
+// that the appliance's other programs give it.
+std::optional<std::string> AccountKey(std::string_view name, size_t key_size = kUserKeySize);
+
+}  // namespace tavo
+
+#endif

@@ -1,0 +1,134 @@
+// One locked use of the stores of an account family.
+#include "account/detail/account_session.h"
+
+#include "tavo_lock.h"
+
+#include "account/detail/store_seal.h"
+#include "core/detail/keep_fault.h"
+#include "core/detail/owner.h"
+
+#include <array>
+#include <numeric>
+#include <utility>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+
+namespace tavo {
+namespace {
+
+constexpr int kLockSeconds = 5;
+
+}  // namespace
+
+AccountSession::~AccountSession()
+{
+    KeepErrno keep;
+    stores_.clear();
+    const KeepFault keep_fault;
+    Unlock();
+}
+
+int AccountSession::OpenToRead(std::span<const size_t> stores)
+{
+    if (const int code = Lock(kind_.lock, TAVO_LOCK_SHARED))
+        return code;
+    if (SealHolds(kind_.family) && Open(stores) == 0 && IsCurrent())
+        return 0;
+    stores_.clear();
+    Unlock();
+    if (const int code = Lock(kind_.lock, TAVO_LOCK_EXCLUSIVE))
+        return code;
+    if (!system_.Take(kLockSeconds))
+        return ERR_LOCK_FAILED;
+    if (const int code = SealHolds(kind_.family) ? 0 : BuildStores(kind_))
+        return code;
+    system_.Release();
+    if (Open(stores) == 0 && IsCurrent())
+        return 0;
+    stores_.clear();
+    if (const int code = BuildStores(kind_))
+        return code;
+    return Open(stores);
+}
+
+int AccountSession::OpenToChange(unsigned locks)
+{
+    if (const int code = Lock(locks, TAVO_LOCK_EXCLUSIVE))
+        return code;
+    if (!system_.Take(kLockSeconds))
+        return ERR_LOCK_FAILED;
+    std::vector<size_t> all(kind_.family.stores.size());
+    std::iota(all.begin(), all.end(), size_t{0});
+    if (SealHolds(kind_.family) && Open(all) == 0 && IsCurrent())
+        return 0;
+    stores_.clear();
+    if (const int code = BuildStores(kind_))
+        return code;
+    return Open(all);
+}
+
+void AccountSession::BeginChange()
+{
+    BreakSeal(kind_.family);
+}
+
+int AccountSession::Seal()
+{
+    int code = 0;
+    for (const std::unique_ptr<Btree> &store : stores_)
+        if (store)
+            if (const int failed = store->Close())
+                code = failed;
+    stores_.clear();
+    if (code == 0)
+        WriteSeal(kind_.family);
+    return code;
+}
+
+bool AccountSession::Unlock()
+{
+    system_.Release();
+    return locks_ == 0 || ErrTLIBFileUnlock(std::exchange(locks_, 0)) == 0;
+}
+
+int AccountSession::Lock(unsigned locks, unsigned mode)
+{
+    if (ErrTLIBFileLock(locks | mode | TAVO_LOCK_NONBLOCKING, kLockSeconds) != 0)
+        return ERR_LOCK_FAILED;
+    locks_ = locks;
+    return 0;
+}
+
+int AccountSession::Open(std::span<const size_t> stores)
+{
+    stores_.clear();
+    stores_.resize(kind_.family.stores.size());
+    for (const size_t index : stores) {
+        const char *path = kind_.family.stores[index].path;
+        int code = Btree::Open(path, {O_RDWR, true, 0}, stores_[index]);
+        if (code == ERR_ACCESS_DENIED)  // a program without root's rights may still be allowed to read
+            code = Btree::Open(path, {O_RDONLY, true, 0}, stores_[index]);
+        if (code != 0)
+            return ERR_OPEN_FAILED;
+    }
+    return 0;
+}
+
+// The stores' own record of the files that they were built from: a program may have taken it away to ask for a rebuild.
+bool AccountSession::IsCurrent() const
+{
+    for (size_t i = 0; i < stores_.size(); ++i) {
+        struct stat st = {};
+        int32_t synced = 0;
+        if (!stores_[i])
+            continue;
+        if (::lstat(kind_.family.stores[i].text, &st) != 0)
+            st.st_mtime = 0;  // the time of a file that does not exist
+        if (stores_[i]->GetNumber(kSyncTimeKey, synced) != 0 || synced != static_cast<int32_t>(st.st_mtime))
+            return false;
+    }
+    return true;
+}
+
+}  // namespace tavo

@@ -1,0 +1,56 @@
+// One locked use of the stores of an account family: take the locks, bring the stores up to date, open them, and, after a
+// change, seal them again. What goes wrong comes back as a code.
+#ifndef TAVO_ACCOUNT_DETAIL_ACCOUNT_SESSION_H
+#define TAVO_ACCOUNT_DETAIL_ACCOUNT_SESSION_H
+
+#include "account/detail/btree.h"
+#include "account/detail/store_build.h"
+#include "account/detail/system_lock.h"
+
+#include <memory>
+#include <span>
+#include <vector>
+
+namespace tavo {
+
+class AccountSession {
+  public:
+    explicit AccountSession(const AccountKind &kind) : kind_(kind) {}
+    ~AccountSession();
+    AccountSession(const AccountSession &) = delete;
+    AccountSession &operator=(const AccountSession &) = delete;
+
+    // Opens the stores of the family that `stores` lists, under the family's lock, shared. When they must be built anew
+    // the lock is taken exclusively, and kept.
+    // 0, ERR_LOCK_FAILED, ERR_OPEN_FAILED; what BuildStores says.
+    int OpenToRead(std::span<const size_t> stores);
+
+    // Takes `locks` and the system's lock exclusively and opens all stores.
+    int OpenToChange(unsigned locks);
+
+    Btree *Store(size_t index) const { return stores_[index].get(); }
+
+    // To be called before the first change of a store: from here to Seal, a death means that they are built anew.
+    void BeginChange();
+
+    // Closes the stores and seals them: they and the text files agree. ERR_DB_CLOSE when a store could not be written;
+    // then it stays unsealed.
+    int Seal();
+
+    // Gives the locks back; false when that failed. The destructor does the same.
+    bool Unlock();
+
+  private:
+    int Lock(unsigned locks, unsigned mode);
+    int Open(std::span<const size_t> stores);
+    bool IsCurrent() const;
+
+    const AccountKind &kind_;
+    unsigned locks_ = 0;
+    SystemLock system_;
+    std::vector<std::unique_ptr<Btree>> stores_;
+};
+
+}  // namespace tavo
+
+#endif

@@ -1,0 +1,55 @@
+// The index of accounts by id.
+#include "account/detail/id_index.h"
+
+#include "account/detail/colon_fields.h"
+
+#include <cstdio>
+
+namespace tavo {
+namespace {
+
+// The id in the greatest key: what a store without the reserved key hands out next follows that.
+int LastId(Btree &index, int32_t &id)
+{
+    std::string_view key;
+    std::string_view value;
+    index.nCursorType = TAVO_BDB_CURSOR_LAST;
+    const int code = index.Step(true, key, value);
+    if (code == ERR_DB_END)
+        id = 0;
+    else if (code == 0)
+        id = FieldNumber(key.substr(0, key.find('\0'))).value_or(0);
+    return code == ERR_DB_END ? 0 : code;
+}
+
+}  // namespace
+
+std::string IdKey(int32_t id)
+{
+    char key[16];
+    const int length = std::snprintf(key, sizeof key, "%06d", id);
+    return {key, static_cast<size_t>(length) + 1};
+}
+
+int FindFreeId(Btree &index, const IdRange &range, int32_t &id)
+{
+    int32_t current = 0;
+    int code = index.GetNumber(range.current_key, current);
+    if (code == ERR_KEY_NOT_FOUND)
+        code = LastId(index, current);
+    if (code != 0)
+        return ERR_DB_CURSOR;
+    const int32_t begin = current < range.first || current >= range.last ? range.first : current + 1;
+    int32_t candidate = begin;
+    do {
+        std::string_view owner;
+        if (index.Get(IdKey(candidate), owner) != 0) {
+            id = candidate;
+            return 0;
+        }
+        candidate = candidate == range.last ? range.first : candidate + 1;
+    } while (candidate != begin);
+    return range.full;
+}
+
+}  // namespace tavo

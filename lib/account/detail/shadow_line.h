@@ -1,0 +1,31 @@
+// A line of /etc/shadow.
+#ifndef TAVO_ACCOUNT_DETAIL_SHADOW_LINE_H
+#define TAVO_ACCOUNT_DETAIL_SHADOW_LINE_H
+
+#include <cstdint>
+#include <ctime>
+#include <string>
+#include <string_view>
+
+namespace tavo {
+
+struct ShadowLine {
+    std::string name;
+    std::string hash;
+    int32_t expire = -1;         // last valid day; negative: never expires
+    bool cannot_change = false;  // the user may not change the password
+};
+
+// 0, or ERR_FORMAT_ERROR when there are not nine fields.
+int ParseShadowLine(std::string_view text, ShadowLine &line);
+
+// A line as of now. The flag is written as a minimum age above the maximum one: that makes passwd refuse every change.
+std::string FormatShadowLine(const ShadowLine &line, time_t now);
+
+// The same line with another hash; every other field is kept, except that the warning period becomes 7 days.
+// ERR_FORMAT_ERROR as above.
+int ReplaceShadowHash(std::string_view text, std::string_view hash, std::string &out);
+
+}  // namespace tavo
+
+#endif

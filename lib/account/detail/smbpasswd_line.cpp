@@ -1,0 +1,49 @@
+// Reads and writes lines of Samba's password file.
+#include "account/detail/smbpasswd_line.h"
+
+#include "account/detail/colon_fields.h"
+#include "tavo_error.h"
+
+#include <algorithm>
+#include <cstdio>
+
+namespace tavo {
+
+int ParseSmbpasswdLine(std::string_view text, SmbpasswdLine &line)
+{
+    const std::vector<std::string_view> fields = SplitColons(text);
+    if (fields.size() != 7)
+        return ERR_FORMAT_ERROR;
+    line = {std::string(fields[0]), FieldNumber(fields[1]).value_or(-1),
+            std::string(fields[2]), std::string(fields[3]),
+            std::string(fields[4]), std::string(fields[5])};
+    return 0;
+}
+
+std::string FormatSmbpasswdLine(const SmbpasswdLine &line)
+{
+    return line.name + ':' + std::to_string(line.uid) + ':' + line.lm_hash + ':' + line.nt_hash + ':' + line.flags +
+           ':' + line.changed + ':';
+}
+
+std::string SmbChangeTime(time_t now)
+{
+    char text[16];
+    std::snprintf(text, sizeof text, "LCT-%08X", static_cast<uint32_t>(now));
+    return text;
+}
+
+std::string SmbHexHash(const unsigned char *hash)
+{
+    char text[33];
+    for (int i = 0; i < 16; ++i)
+        std::snprintf(text + 2 * i, 3, "%02X", hash[i]);
+    return text;
+}
+
+bool IsSmbHash(std::string_view text)
+{
+    return text.size() == 32 && text.find_first_not_of("0123456789ABCDEFabcdef") == std::string_view::npos;
+}
+
+}  // namespace tavo

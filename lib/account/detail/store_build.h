@@ -1,0 +1,24 @@
+// Builds the stores of a family anew from its text files.
+#ifndef TAVO_ACCOUNT_DETAIL_STORE_BUILD_H
+#define TAVO_ACCOUNT_DETAIL_STORE_BUILD_H
+
+#include "account/detail/store_content.h"
+#include "account/detail/store_family.h"
+
+namespace tavo {
+
+// An account family as the session needs to know it.
+struct AccountKind {
+    const StoreFamily &family;
+    unsigned lock;                    // the lock that guards its stores and text files
+    bool (*read)(StoreContent &out);  // reads the text files; false when one is there but cannot be read
+};
+
+// Completes a half-done commit, reads the text files and puts new stores in place of the old ones, whatever those are;
+// old ones that were stores are kept as "NAME.bak". The locks must be held exclusively.
+// 0, ERR_OPEN_FAILED, ERR_READ_FAILED, ERR_NOT_ENOUGH_SPACE or ERR_RENAME_FAILED.
+int BuildStores(const AccountKind &kind);
+
+}  // namespace tavo
+
+#endif

@@ -1,0 +1,151 @@
+// Reads, stores and removes one account in the open stores of the user family.
+#include "account/detail/user_accounts.h"
+
+#include "account/detail/account_name.h"
+#include "account/detail/account_session.h"
+#include "account/detail/id_index.h"
+#include "account/detail/misc_line.h"
+#include "account/detail/shadow_line.h"
+#include "account/detail/user_texts.h"
+
+namespace tavo {
+namespace {
+
+constexpr std::string_view kLocked = "*";  // the hash of an account without a shadow line: nobody logs in with it
+
+std::string WithNul(std::string_view line)
+{
+    return std::string(line).append(1, '\0');
+}
+
+// An absent line leaves the record as it is.
+template <class Line>
+int ReadOptional(TAVOBDB *store, std::string_view key, int (*parse)(std::string_view, Line &), Line &line)
+{
+    std::string_view value;
+    const int code = Btree::Of(store)->Get(key, value);
+    return code == 0 ? parse(value, line) : code == ERR_KEY_NOT_FOUND ? 0 : code;
+}
+
+int Privilege(std::string_view key, const MiscLine &misc)
+{
+    return key == WithNul("ADMIN") ? int{TAVO_USER_PRIVILEGE_ADMIN} : misc.privilege;
+}
+
+// Absent entries are no failure: accounts of the system have no Samba and misc lines.
+int DeleteEntry(TAVOBDB *store, std::string_view key)
+{
+    const int code = Btree::Of(store)->Delete(key);
+    return code == ERR_KEY_NOT_FOUND ? 0 : code;
+}
+
+// Of accounts that share an id one has the index entry.
+bool HasIndex(const TAVOUSERDB &db, int32_t uid, std::string_view key)
+{
+    std::string_view owner;
+    return Btree::Of(db.pUid)->Get(IdKey(uid), owner) == 0 && owner == key;
+}
+
+}  // namespace
+
+TAVOUSERDB UserDb(const AccountSession &session)
+{
+    return {session.Store(kNameStore), session.Store(kMiscStore), session.Store(kShadowStore), session.Store(kSmbStore),
+            session.Store(kUidStore)};
+}
+
+bool IsReservedKey(std::string_view key)
+{
+    return key == WithNul("ROOT") || key == WithNul("ADMIN");
+}
+
+int ReadPasswdLine(const TAVOUSERDB &db, std::string_view key, PasswdLine &line)
+{
+    std::string_view value;
+    const int code = Btree::Of(db.pName)->Get(key, value);
+    return code == 0 ? ParsePasswdLine(value, line) : code;
+}
+
+int ReadUser(const TAVOUSERDB &db, std::string_view key, TAVOUSER **user)
+{
+    PasswdLine passwd;
+    ShadowLine shadow;
+    MiscLine misc;
+    shadow.hash = kLocked;
+    int code = ReadPasswdLine(db, key, passwd);
+    if (code != 0)
+        return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
+    if ((code = ReadOptional(db.pShadow, key, ParseShadowLine, shadow)) != 0 ||
+        (code = ReadOptional(db.pMisc, key, ParseMiscLine, misc)) != 0)
+        return code;
+    if (TAVOUserAlloc(user, passwd.name.c_str(), shadow.hash.c_str(), passwd.uid, passwd.gid,
+                      passwd.description.c_str(), passwd.home.c_str(), passwd.shell.c_str(), shadow.expire,
+                      shadow.cannot_change, misc.mail.c_str(), Privilege(key, misc)) != 0)
+        return tavoerrno;
+    return 0;
+}
+
+int FindUserKey(const TAVOUSERDB &db, int32_t uid, std::string &key)
+{
+    std::string_view owner;
+    PasswdLine line;
+    if (Btree::Of(db.pUid)->Get(IdKey(uid), owner) == 0 && ReadPasswdLine(db, owner, line) == 0 && line.uid == uid) {
+        key = owner;
+        return 0;
+    }
+    // It may share its id with another account, which has the index entry, or have lost it with that one.
+    Btree &names = *Btree::Of(db.pName);
+    std::string_view name;
+    std::string_view value;
+    int code;
+    for (names.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = names.Step(true, name, value)) == 0;
+         names.nCursorType = TAVO_BDB_CURSOR_NEXT) {
+        if (ParsePasswdLine(value, line) == 0 && line.uid == uid) {
+            key = name;
+            return 0;
+        }
+    }
+    return code == ERR_DB_END ? int{ERR_NO_SUCH_USER} : code;
+}
+
+int StoreUser(const TAVOUSERDB &db, const UserChange &change)
+{
+    int code = 0;
+    const bool renamed = !change.old_key.empty() && change.old_key != change.key;
+    for (TAVOBDB *store : {db.pName, db.pMisc, db.pShadow, db.pSmb})
+        if (renamed && (code = DeleteEntry(store, change.old_key)) != 0)
+            return code;
+    if (!change.keep_index) {
+        if (!change.old_key.empty() && HasIndex(db, change.old_uid, change.old_key) &&
+            (code = DeleteEntry(db.pUid, IdKey(change.old_uid))) != 0)
+            return code;
+        std::string_view other;
+        if (Btree::Of(db.pUid)->Get(IdKey(change.uid), other) != 0 &&
+            (code = Btree::Of(db.pUid)->Set(IdKey(change.uid), change.key)) != 0)
+            return code;
+    }
+    const struct {
+        TAVOBDB *store;
+        const std::string &line;
+    } rows[] = {{db.pName, change.passwd_line},
+                {db.pMisc, change.misc_line},
+                {db.pShadow, change.shadow_line},
+                {db.pSmb, change.smb_line}};
+    for (const auto &row : rows)
+        if ((code = Btree::Of(row.store)->Set(change.key, WithNul(row.line))) != 0)
+            return code;
+    return 0;
+}
+
+int RemoveUser(const TAVOUSERDB &db, const std::string &key, int32_t uid)
+{
+    if (HasIndex(db, uid, key))
+        if (const int code = DeleteEntry(db.pUid, IdKey(uid)))
+            return code;
+    for (TAVOBDB *store : {db.pName, db.pMisc, db.pShadow, db.pSmb})
+        if (const int code = DeleteEntry(store, key))
+            return code;
+    return 0;
+}
+
+}  // namespace tavo

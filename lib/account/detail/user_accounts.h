@@ -1,0 +1,59 @@
+// Reads, writes and removes one account in the open stores of the user family. Codes come back; nothing is logged.
+#ifndef TAVO_ACCOUNT_DETAIL_USER_ACCOUNTS_H
+#define TAVO_ACCOUNT_DETAIL_USER_ACCOUNTS_H
+
+#include "account/detail/passwd_line.h"
+#include "tavo_user.h"
+
+#include <ctime>
+#include <string>
+#include <string_view>
+
+namespace tavo {
+
+class AccountSession;
+
+inline constexpr char kHomes[] = "/var/services/homes/";
+inline constexpr char kDefaultShell[] = "/bin/csh";
+
+// The stores of a session as the functions here, and callers, know them.
+TAVOUSERDB UserDb(const AccountSession &session);
+
+// 0, ERR_KEY_NOT_FOUND, ERR_FORMAT_ERROR, ERR_INVALID_USERNAME, ERR_DB_CURSOR ...
+int ReadPasswdLine(const TAVOUSERDB &db, std::string_view key, PasswdLine &line);
+
+// Fills a record from the stores name, shadow and misc. ERR_NO_SUCH_USER; codes of TAVOUserAlloc.
+int ReadUser(const TAVOUSERDB &db, std::string_view key, TAVOUSER **user);
+
+// The key of the account with this user id: ERR_NO_SUCH_USER when there is none.
+int FindUserKey(const TAVOUSERDB &db, int32_t uid, std::string &key);
+
+// What is about to be stored for one account, complete: storing it cannot be refused any more.
+struct UserChange {
+    std::string old_key;   // of the account that is replaced; empty when one is added
+    std::string old_name;  // as it stood
+    int32_t old_uid = -1;
+    std::string old_hash;
+    bool keep_index = false;  // root and admin keep the index entry that they have
+    std::string key;
+    int32_t uid = -1;
+    bool new_password = false;
+    std::string passwd_line;
+    std::string misc_line;
+    std::string shadow_line;
+    std::string smb_line;
+};
+
+// Refuses with one of the codes of TAVOUserSet's entries; changes nothing.
+int PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user, time_t now, UserChange &change);
+
+// Fails only when a store cannot be changed; then the stores are no longer to be trusted.
+int StoreUser(const TAVOUSERDB &db, const UserChange &change);
+int RemoveUser(const TAVOUSERDB &db, const std::string &key, int32_t uid);
+
+// "root" and "admin" are never deleted or renamed.
+bool IsReservedKey(std::string_view key);
+
+}  // namespace tavo
+
+#endif

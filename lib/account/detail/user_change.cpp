@@ -1,0 +1,146 @@
+// Works out what is to be stored for an account that is added or changed, and refuses what must not be.
+#include "account/detail/account_name.h"
+#include "account/detail/btree.h"
+#include "account/detail/colon_fields.h"
+#include "account/detail/misc_line.h"
+#include "account/detail/password_hash.h"
+#include "account/detail/shadow_line.h"
+#include "account/detail/smbpasswd_line.h"
+#include "account/detail/user_accounts.h"
+
+namespace tavo {
+namespace {
+
+// Programs read these lines with buffers of 1024 bytes.
+constexpr size_t kLongestField = 512;
+
+const char *Text(const char *text)
+{
+    return text ? text : "";
+}
+
+bool IsPath(std::string_view text)
+{
+    return text.starts_with('/') && (std::string(text) + '/').find("/../") == std::string::npos;
+}
+
+bool FieldsFit(const TAVOUSER &user)
+{
+    const std::string_view home = Text(user.szHome);
+    const std::string_view shell = Text(user.szShell);
+    const struct {
+        std::string_view text;
+        bool colon_ends_it;
+    } fields[] = {{Text(user.szDesc), false}, {home, true}, {shell, true}, {Text(user.szMail), true}};
+    for (const auto &field : fields)
+        if (field.text.size() > kLongestField || !FitsInField(field.text, field.colon_ends_it))
+            return false;
+    return (home.empty() || IsPath(home)) && (shell.empty() || IsPath(shell)) && user.nUid >= -1 && user.nGid >= -1;
+}
+
+struct OldUser {
+    PasswdLine passwd;
+    ShadowLine shadow;
+    SmbpasswdLine smb;
+};
+
+int ReadOld(const TAVOUSERDB &db, std::string_view key, OldUser &old)
+{
+    int code = ReadPasswdLine(db, key, old.passwd);
+    if (code != 0)
+        return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
+    old.shadow.hash = "*";
+    old.smb.lm_hash = old.smb.nt_hash = kNoSmbHash;
+    std::string_view value;
+    if (Btree::Of(db.pShadow)->Get(key, value) == 0 && (code = ParseShadowLine(value, old.shadow)) != 0)
+        return code;
+    if (Btree::Of(db.pSmb)->Get(key, value) == 0 && (code = ParseSmbpasswdLine(value, old.smb)) != 0)
+        return code;
+    return 0;
+}
+
+// A password that is the stored hash stays, with its Samba hashes; any other is clear text.
+int ChoosePassword(const char *password, const OldUser *old, time_t now, UserChange &change, std::string &hash,
+                   SmbpasswdLine &smb)
+{
+    if (old && old->shadow.hash == password) {
+        hash = old->shadow.hash;
+        smb.lm_hash = old->smb.lm_hash;
+        smb.nt_hash = old->smb.nt_hash;
+        return 0;
+    }
+    hash = HashPassword(password, old ? std::string_view(old->shadow.hash) : std::string_view(), now);
+    if (hash.empty())
+        return ERR_BAD_PARAMETERS;
+    unsigned char digest[16];
+    if (TLIBSmbLmHash(password, digest) != 0)
+        return tavoerrno;
+    smb.lm_hash = SmbHexHash(digest);
+    if (TLIBSmbMd4Hash(password, digest) != 0)
+        return tavoerrno;
+    smb.nt_hash = SmbHexHash(digest);
+    change.new_password = true;
+    return 0;
+}
+
+int FindOld(const TAVOUSERDB &db, const char *old_name, UserChange &change, OldUser &old)
+{
+    const std::optional<std::string> key = AccountKey(old_name);
+    if (!key)
+        return ERR_NO_SUCH_USER;
+    if (const int code = ReadOld(db, *key, old))
+        return code;
+    change.old_key = *key;
+    change.old_name = old.passwd.name;
+    change.old_uid = old.passwd.uid;
+    change.old_hash = old.shadow.hash;
+    change.keep_index = IsReservedKey(*key);
+    return change.keep_index && change.key != *key ? int{ERR_USER_DB_DELETE} : 0;
+}
+
+}  // namespace
+
+int PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user, time_t now, UserChange &change)
+{
+    if (!IsAccountName(user.szName, kUserNameChars) || IsDotName(user.szName))
+        return ERR_INVALID_USERNAME;
+    const std::optional<std::string> key = AccountKey(user.szName);
+    if (!key)
+        return ERR_INVALID_USERNAME;
+    if (!FieldsFit(user))
+        return ERR_BAD_PARAMETERS;
+    change = {};
+    change.key = *key;
+    OldUser old;
+    if (old_name)
+        if (const int code = FindOld(db, old_name, change, old))
+            return code;
+    std::string_view taken;
+    if (change.old_key != change.key && Btree::Of(db.pName)->Get(change.key, taken) == 0)
+        return ERR_USER_EXISTS;
+
+    const std::string name = user.szName;
+    change.uid = old_name && (user.nUid < 0 || change.keep_index) ? old.passwd.uid : user.nUid;
+    if (change.uid < 0 && !old_name)
+        return ERR_BAD_PARAMETERS;
+    PasswdLine passwd{name,
+                      change.uid,
+                      user.nGid < 0 ? int32_t{TAVO_USER_GID_DEFAULT} : user.nGid,
+                      Text(user.szDesc),
+                      *Text(user.szHome) ? user.szHome : kHomes + name,
+                      *Text(user.szShell) ? user.szShell : kDefaultShell};
+    ShadowLine shadow{name, {}, user.nExpired, user.fCannotChgPasswd != 0};
+    SmbpasswdLine smb;
+    smb.name = name;
+    smb.uid = change.uid;
+    smb.changed = SmbChangeTime(now);
+    if (const int code = ChoosePassword(Text(user.szPasswd), old_name ? &old : nullptr, now, change, shadow.hash, smb))
+        return code;
+    change.passwd_line = FormatPasswdLine(passwd);
+    change.misc_line = FormatMiscLine({name, user.nPrivilege, Text(user.szMail)});
+    change.shadow_line = FormatShadowLine(shadow, now);
+    change.smb_line = FormatSmbpasswdLine(smb);
+    return 0;
+}
+
+}  // namespace tavo

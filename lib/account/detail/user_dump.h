@@ -1,0 +1,29 @@
+// Writes the four text files of the user family from its open stores.
+#ifndef TAVO_ACCOUNT_DETAIL_USER_DUMP_H
+#define TAVO_ACCOUNT_DETAIL_USER_DUMP_H
+
+#include "tavo_user.h"
+
+#include <string>
+#include <vector>
+
+namespace tavo {
+
+// What a rewrite of the files has to tell: the caller logs it.
+struct DumpReport {
+    struct Missing {
+        std::string name;  // of an account
+        const char *file;  // that has no line of it
+    };
+    std::vector<Missing> missing;
+    const char *not_opened = nullptr;  // the temporary file of ERR_OPEN_FAILED
+    std::string lost;                  // the account that would have been lost
+};
+
+// 0, ERR_OPEN_FAILED, ERR_WRITE_FAILED, ERR_NOT_ENOUGH_SPACE, ERR_RENAME_FAILED, ERR_FORMAT_ERROR (a store holds a line
+// that is no account), or a code of the stores.
+int DumpUsers(const TAVOUSERDB &db, DumpReport &report);
+
+}  // namespace tavo
+
+#endif

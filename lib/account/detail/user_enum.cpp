@@ -1,0 +1,82 @@
+// Which accounts an enumeration lists.
+#include "account/detail/user_enum.h"
+
+#include "account/detail/account_name.h"
+#include "account/detail/account_session.h"
+#include "account/detail/passwd_line.h"
+#include "account/detail/setting_switch.h"
+#include "account/detail/user_texts.h"
+#include "core/detail/list_owner.h"
+#include "tavo_appliance.h"
+#include "tavo_user.h"
+
+#include <array>
+
+namespace tavo {
+namespace {
+
+constexpr int kAllFlags = TAVO_USER_LOCAL | TAVO_USER_DOMAIN | TAVO_USER_DOMAIN_USED;
+
+bool IsListed(const PasswdLine &account, bool guest_is_supported)
+{
+    if (account.uid == 0 && account.name != "root")
+        return false;
+    return IsDomainName(account.name) || account.uid == -1 ||
+           (account.uid >= TAVO_USER_UID_MIN && (account.uid != TAVO_USER_UID_GUEST || guest_is_supported));
+}
+
+int AddDomainUsersInUse(const KeyFilter &wanted, std::vector<std::string> &names)
+{
+    ListOwner list(PslTLIBSzListAlloc(1024));
+    if (!list)
+        return ERR_OUT_OF_MEMORY;
+    const int count = TAVOPushDUserUsed(list.Addr());
+    if (count < 0)
+        return ERR_ENUM_FAILED;
+    for (int i = 0; i < count; ++i) {
+        const std::string name = SzTLIBSzListGet(list.Get(), i);
+        const std::optional<std::string> key = AccountKey(name);
+        if (key && wanted(std::string_view(*key).substr(0, key->size() - 1)))
+            names.push_back(name);
+    }
+    return 0;
+}
+
+}  // namespace
+
+bool PushNames(TLIBSZLIST **list, const std::vector<std::string> &names)
+{
+    for (const std::string &name : names)
+        if (TLIBSzListPush(list, name.c_str()) < 0)
+            return false;
+    return true;
+}
+
+int ListUsers(int flags, const KeyFilter &wanted, std::vector<std::string> &names)
+{
+    if ((flags & kAllFlags) == 0)
+        return ERR_BAD_PARAMETERS;
+    if ((flags & TAVO_USER_DOMAIN_USED) != 0)
+        if (const int code = AddDomainUsersInUse(wanted, names))
+            return code;
+    AccountSession session(kUserKind);
+    if (const int code = session.OpenToRead(std::array{size_t{kNameStore}}))
+        return code;
+    const bool guest_is_supported = SettingIsYes(kFactorySettings, "supportguest");
+    Btree &accounts = *session.Store(kNameStore);
+    std::string_view key;
+    std::string_view value;
+    int code;
+    for (accounts.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = accounts.Step(true, key, value)) == 0;
+         accounts.nCursorType = TAVO_BDB_CURSOR_NEXT) {
+        PasswdLine account;
+        if (ParsePasswdLine(value, account) != 0)
+            continue;
+        const int kind = IsDomainName(account.name) ? TAVO_USER_DOMAIN : TAVO_USER_LOCAL;
+        if ((flags & kind) != 0 && IsListed(account, guest_is_supported) && wanted(key.substr(0, key.find('\0'))))
+            names.push_back(account.name);
+    }
+    return code == ERR_DB_END ? 0 : int{ERR_ENUM_FAILED};
+}
+
+}  // namespace tavo

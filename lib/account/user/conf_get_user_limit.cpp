@@ -1,0 +1,37 @@
+// Tells how many more accounts may be created.
+#include "tavo_user.h"
+
+#include "account/detail/setting_switch.h"
+#include "core/detail/fault.h"
+#include "tavo_file.h"
+
+#include <charconv>
+#include <cstring>
+
+namespace {
+
+constexpr int kLongestNumber = 32;
+
+}  // namespace
+
+extern "C" int TAVOConfGetUserLimit(void)
+{
+    const int count = TAVOUserTotalNum(TAVO_USER_LOCAL | TAVO_USER_DOMAIN);
+    if (count < 0)
+        return -1;
+    char text[kLongestNumber + 1];
+    const int length = TLIBFileGetKeyValue(tavo::kFactorySettings, "maxaccounts", text, sizeof text, 0);
+    if (length < 0)
+        return -1;
+    if (length == 0)
+        return Fail(ERR_KEY_NOT_FOUND);
+    if (text[0] == 0)
+        return 0;
+    int limit = 0;
+    const char *end = text + std::strlen(text);
+    const auto [stop, error] = std::from_chars(text, end, limit);
+    if (error != std::errc() || stop != end || limit < 0)
+        return Fail(ERR_FORMAT_ERROR);
+    // -1 is the failure: an appliance with one account more than it may have has no room for a second one either.
+    return limit - count == -1 ? -2 : limit - count;
+}

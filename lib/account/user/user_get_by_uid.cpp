@@ -1,0 +1,27 @@
+// Reads one account by its user id.
+#include "tavo_user.h"
+
+#include "account/detail/account_session.h"
+#include "account/detail/user_accounts.h"
+#include "account/detail/user_texts.h"
+#include "core/detail/guard.h"
+
+#include <array>
+
+extern "C" int TAVOUserGetByUID(int uid, TAVOUSER **ppUser)
+{
+    if (!ppUser)
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        tavo::AccountSession session(tavo::kUserKind);
+        constexpr std::array stores{size_t{tavo::kNameStore}, size_t{tavo::kShadowStore}, size_t{tavo::kMiscStore},
+                                    size_t{tavo::kUidStore}};
+        if (const int code = session.OpenToRead(stores))
+            return Fail(code);
+        std::string key;
+        int code = tavo::FindUserKey(tavo::UserDb(session), uid, key);
+        if (code == 0)
+            code = tavo::ReadUser(tavo::UserDb(session), key, ppUser);
+        return code == 0 ? 0 : Fail(code);
+    });
+}

@@ -1,0 +1,115 @@
+// Stores password hashes that were computed elsewhere.
+#include "tavo_user.h"
+
+#include "account/detail/account_name.h"
+#include "account/detail/account_session.h"
+#include "account/detail/colon_fields.h"
+#include "account/detail/shadow_line.h"
+#include "account/detail/smbpasswd_line.h"
+#include "account/detail/user_accounts.h"
+#include "account/detail/user_texts.h"
+#include "core/detail/guard.h"
+#include "core/detail/log.h"
+#include "tavo_appliance.h"
+#include "tavo_lock.h"
+
+namespace {
+
+constexpr int kAccountsChanged = 47;  // for the event daemon
+
+struct NewHashes {
+    const char *unix_hash;
+    const char *lm_hash;
+    const char *nt_hash;
+};
+
+// The two lines with the new hashes, or why not.
+int ReplaceHashes(const TAVOUSERDB &db, std::string_view key, const NewHashes &hashes, std::string &shadow,
+                  std::string &samba)
+{
+    if (!tavo::FitsInField(hashes.unix_hash, true) || !tavo::IsSmbHash(hashes.lm_hash) ||
+        !tavo::IsSmbHash(hashes.nt_hash))
+        return ERR_BAD_PARAMETERS;
+    tavo::PasswdLine account;
+    int code = tavo::ReadPasswdLine(db, key, account);
+    if (code != 0)
+        return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
+    std::string_view line;
+    if ((code = tavo::Btree::Of(db.pShadow)->Get(key, line)) != 0 ||
+        (code = tavo::ReplaceShadowHash(line, hashes.unix_hash, shadow)) != 0)
+        return code;
+    tavo::SmbpasswdLine old;
+    old.name = account.name;
+    old.uid = account.uid;
+    old.changed = tavo::SmbChangeTime(::time(nullptr));
+    code = tavo::Btree::Of(db.pSmb)->Get(key, line);
+    if (code == 0)
+        code = tavo::ParseSmbpasswdLine(line, old);
+    else if (code == ERR_KEY_NOT_FOUND)
+        code = 0;  // an account of the system gets its first Samba password
+    old.lm_hash = hashes.lm_hash;
+    old.nt_hash = hashes.nt_hash;
+    samba = tavo::FormatSmbpasswdLine(old);
+    return code;
+}
+
+struct Outcome {
+    int code = 0;
+    bool damaged = false;
+};
+
+Outcome SetHashes(const TAVOUSERDB &db, const char *name, const NewHashes &hashes)
+{
+    const std::optional<std::string> key = tavo::AccountKey(name);
+    if (!key)
+        return {ERR_INVALID_USERNAME};
+    std::string shadow;
+    std::string samba;
+    if (const int code = ReplaceHashes(db, *key, hashes, shadow, samba))
+        return {code};
+    shadow.push_back('\0');
+    samba.push_back('\0');
+    int code = tavo::Btree::Of(db.pShadow)->Set(*key, shadow);
+    if (code == 0)
+        code = tavo::Btree::Of(db.pSmb)->Set(*key, samba);
+    return {code, code != 0};
+}
+
+}  // namespace
+
+extern "C" int TAVOUserSetPasswd(const TAVOUSER *const *rgpUser, const char *const *rgszHash,
+                                 const char *const *rgszLmHash, const char *const *rgszNtHash, int nUser)
+{
+    if (!rgpUser || !rgszHash || !rgszLmHash || !rgszNtHash || nUser < 0)
+        return Fail(ERR_BAD_PARAMETERS);
+    if (nUser == 0)
+        return 0;
+    return Guard([&] {
+        tavo::AccountSession session(tavo::kUserKind);
+        if (const int code = session.OpenToChange(TAVO_LOCK_USER))
+            return Fail(code);
+        TAVOUSERDB db = tavo::UserDb(session);
+        bool changed = false;
+        session.BeginChange();
+        for (int i = 0; i < nUser; ++i) {
+            if (!rgpUser[i] || !rgpUser[i]->szName || !rgszHash[i] || !rgszLmHash[i] || !rgszNtHash[i])
+                continue;
+            const Outcome outcome = SetHashes(db, rgpUser[i]->szName, {rgszHash[i], rgszLmHash[i], rgszNtHash[i]});
+            if (outcome.code != 0) {
+                Fail(outcome.code);
+                tavo::WriteLog(LOG_NOTICE, "%s:%d Failed to set the password of [%s], tavoerr=0x%04X",
+                               {tavo::kModule, __LINE__, rgpUser[i]->szName, outcome.code});
+            }
+            if (outcome.damaged)
+                return -1;
+            changed = changed || outcome.code == 0;
+        }
+        if (changed && TAVOUserDBDump(&db) != 0)
+            return -1;
+        if (session.Seal() != 0)
+            LogError("%s:%d Failed to close the account stores, errno=%d", errno);
+        const bool unlocked = session.Unlock();
+        TLIBScemdNotify(kAccountsChanged);
+        return unlocked ? 0 : Fail(ERR_UNLOCK_FAILED);
+    });
+}

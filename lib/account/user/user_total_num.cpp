@@ -1,0 +1,16 @@
+// Counts the accounts.
+#include "tavo_user.h"
+
+#include "account/detail/user_enum.h"
+#include "core/detail/guard.h"
+
+extern "C" int TAVOUserTotalNum(int flags)
+{
+    return Guard([&] {
+        std::vector<std::string> names;
+        if (const int code = tavo::ListUsers(
+                flags, [](std::string_view) { return true; }, names))
+            return Fail(code);
+        return static_cast<int>(names.size());
+    });
+}

@@ -1,0 +1,121 @@
+// Users as the tests make them, and the files that they end up in.
+#ifndef TESTS_ACCOUNT_USER_USER_FIXTURE_H
+#define TESTS_ACCOUNT_USER_USER_FIXTURE_H
+
+#include "tavo_user.h"
+
+#include "support/scratch_dir.h"
+
+#include <array>
+#include <filesystem>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace test {
+
+inline constexpr std::array<const char *, 4> kAccountFiles{"/etc/passwd", "/etc/shadow", "/etc/tavouser.conf",
+                                                           "/usr/tavo/etc/private/smbpasswd"};
+
+struct FreeUser {
+    void operator()(TAVOUSER *user) const { TAVOUserFree(user); }
+};
+using User = std::unique_ptr<TAVOUSER, FreeUser>;
+
+struct UserTexts {
+    std::string name;
+    std::string password = "";
+    int uid = -1;
+    int gid = -1;
+    std::string description = "";
+    std::string home = "";
+    std::string shell = "";
+    int expire = -1;
+    bool cannot_change = false;
+    std::string mail = "";
+    int privilege = 0;
+};
+
+inline User MakeUser(const UserTexts &texts)
+{
+    TAVOUSER *user = nullptr;
+    TAVOUserAlloc(&user, texts.name.c_str(), texts.password.c_str(), texts.uid, texts.gid, texts.description.c_str(),
+                  texts.home.c_str(), texts.shell.c_str(), texts.expire, texts.cannot_change, texts.mail.c_str(),
+                  texts.privilege);
+    return User(user);
+}
+
+inline User GetUser(const std::string &name)
+{
+    TAVOUSER *user = nullptr;
+    return TAVOUserGet(name.c_str(), &user) == 0 ? User(user) : User();
+}
+
+// The code of the entry, 0 when it was applied: TAVOUserSetOne itself succeeds also when its entry is refused.
+inline int SetUser(const std::optional<std::string> &old_name, const TAVOUSER *user)
+{
+    TLIBErrSet(ERR_SUCCESS);
+    const int result = TAVOUserSetOne(old_name ? old_name->c_str() : nullptr, user);
+    return result == 0 || TLIBErrGet() != 0 ? TLIBErrGet() : -1;
+}
+
+inline int AddUser(const UserTexts &texts)
+{
+    return SetUser(std::nullopt, MakeUser(texts).get());
+}
+
+inline int DeleteUser(const std::string &name)
+{
+    TLIBErrSet(ERR_SUCCESS);
+    const char *const names[] = {name.c_str()};
+    const int result = TAVOUserDelete(names, 1);
+    return result == 0 || TLIBErrGet() != 0 ? TLIBErrGet() : -1;
+}
+
+inline int Rename(const std::string &old_name, const std::string &new_name)
+{
+    const User old = GetUser(old_name);
+    if (!old)
+        return ERR_NO_SUCH_USER;
+    TAVOUSER renamed = *old;
+    renamed.szName = const_cast<char *>(new_name.c_str());
+    return SetUser(old_name, &renamed);
+}
+
+inline std::string FileText(const char *path)
+{
+    return std::filesystem::exists(path) ? ReadFile(path) : std::string();
+}
+
+inline std::array<std::string, 4> AllFiles()
+{
+    std::array<std::string, 4> texts;
+    for (size_t i = 0; i < texts.size(); ++i)
+        texts[i] = FileText(kAccountFiles[i]);
+    return texts;
+}
+
+inline std::vector<std::string> Lines(const std::string &text)
+{
+    std::vector<std::string> lines;
+    for (size_t at = 0; at < text.size();) {
+        const size_t end = text.find('\n', at);
+        lines.push_back(text.substr(at, end - at));
+        at = end == text.npos ? text.size() : end + 1;
+    }
+    return lines;
+}
+
+// The line of an account; empty when there is none.
+inline std::string LineOf(const char *path, const std::string &name)
+{
+    for (const std::string &line : Lines(FileText(path)))
+        if (line.starts_with(name + ":"))
+            return line;
+    return {};
+}
+
+}  // namespace test
+
+#endif
