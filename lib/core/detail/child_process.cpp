@@ -96,7 +96,8 @@ void SetSignals(const ChildPlan &plan, const sigset_t &parent_mask)
     if (plan.close_others)
         CloseOtherDescriptors();
     SetSignals(plan, parent_mask);
-    ::execve(plan.program, plan.arguments, plan.environment);
+    if (plan.program && plan.arguments)
+        ::execve(plan.program, plan.arguments, plan.environment);
     GiveUp(plan);
 }
 
