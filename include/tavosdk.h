@@ -18,6 +18,7 @@
 #include "tavo_partition.h"
 #include "tavo_proc.h"
 #include "tavo_quota.h"
+#include "tavo_raid.h"
 #include "tavo_section.h"
 #include "tavo_str.h"
 #include "tavo_user.h"

@@ -1,0 +1,15 @@
+// Tells how many internal bays the model has.
+#include "tavo_appliance.h"
+
+#include "core/detail/guard.h"
+#include "core/detail/model_setting.h"
+
+extern "C" int TAVOMaxDiskGet(void)
+{
+    constexpr unsigned long usual = 4;
+    constexpr unsigned long most = 10;  // "/dev/sda" to "/dev/sdj"; the letters after them are external ports
+    return Guard([&] {
+        const unsigned long bays = tavo::ModelNumber("maxdisks").value_or(usual);
+        return static_cast<int>(bays == 0 ? usual : bays < most ? bays : most);
+    });
+}

@@ -1,0 +1,38 @@
+// What the model can do.
+#include "core/detail/model_setting.h"
+
+#include "core/detail/key_value_line.h"
+#include "core/detail/line_search.h"
+
+#include <charconv>
+
+#include <strings.h>
+
+namespace tavo {
+
+std::optional<std::string> ModelSetting(const char *key)
+{
+    FoundLine line;
+    if (FindLineByKey(kModelSettings, key, Match::first, line) != 0)
+        return std::nullopt;
+    return std::string(LineValue(line.text));
+}
+
+bool ModelHas(const char *key)
+{
+    const std::optional<std::string> value = ModelSetting(key);
+    return value && ::strcasecmp(value->c_str(), "yes") == 0;
+}
+
+std::optional<unsigned long> ModelNumber(const char *key)
+{
+    const std::optional<std::string> value = ModelSetting(key);
+    if (!value)
+        return std::nullopt;
+    unsigned long number = 0;
+    const char *const end = value->data() + value->size();
+    const auto [stop, error] = std::from_chars(value->data(), end, number);
+    return error == std::errc{} && stop == end ? std::optional(number) : std::nullopt;
+}
+
+}  // namespace tavo

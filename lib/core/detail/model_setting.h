@@ -1,0 +1,23 @@
+// What the model can do: /etc.defaults/tavoinfo.conf. Asking is no failure, so no error state is touched.
+#ifndef TAVO_CORE_DETAIL_MODEL_SETTING_H
+#define TAVO_CORE_DETAIL_MODEL_SETTING_H
+
+#include <optional>
+#include <string>
+
+namespace tavo {
+
+inline constexpr const char *kModelSettings = "/etc.defaults/tavoinfo.conf";
+
+// The value of a key; empty when the model does not say. Throws bad_alloc.
+std::optional<std::string> ModelSetting(const char *key);
+
+// Whether the model has what the key is about: "yes".
+bool ModelHas(const char *key);
+
+// A number of the model, strictly decimal; empty when the model does not say or says something else.
+std::optional<unsigned long> ModelNumber(const char *key);
+
+}  // namespace tavo
+
+#endif

@@ -1,0 +1,29 @@
+// Runs the commands that change a disk's partitions.
+#ifndef TAVO_STORAGE_DETAIL_PARTITION_COMMAND_H
+#define TAVO_STORAGE_DETAIL_PARTITION_COMMAND_H
+
+#include "core/detail/run_command.h"
+#include "core/detail/shell_command.h"
+
+#include <string>
+
+namespace tavo {
+
+struct CommandResult {
+    std::string command;
+    int status;  // the exit status; -1 when it was not run or was killed
+};
+
+template <class... Args>
+CommandResult RunDiskCommand(const char *format, const Args &...args)
+{
+    const std::optional<std::string> command = ShellCommand(format, args...);
+    if (!command)
+        return {format, -1};
+    const int status = RunCommand(*command);
+    return {*command, status};
+}
+
+}  // namespace tavo
+
+#endif

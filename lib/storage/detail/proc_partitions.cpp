@@ -1,0 +1,73 @@
+// /proc/partitions.
+#include "storage/detail/proc_partitions.h"
+
+#include "tavo_error.h"
+
+#include <algorithm>
+#include <charconv>
+
+namespace tavo {
+namespace {
+
+constexpr unsigned kIdeMajors[] = {3, 22, 33, 34, 56, 57, 88, 89, 90, 91};
+constexpr unsigned kLargestMinor = 255;  // a device number has eight bits for it
+
+std::string_view TakeField(std::string_view &line)
+{
+    constexpr std::string_view blanks = " \t\r\n";
+    const size_t begin = std::min(line.find_first_not_of(blanks), line.size());
+    line.remove_prefix(begin);
+    const std::string_view field = line.substr(0, line.find_first_of(blanks));
+    line.remove_prefix(field.size());
+    return field;
+}
+
+template <class Number>
+bool TakeNumber(std::string_view &line, Number &number)
+{
+    const std::string_view field = TakeField(line);
+    const auto [end, error] = std::from_chars(field.data(), field.data() + field.size(), number);
+    return !field.empty() && error == std::errc{} && end == field.data() + field.size();
+}
+
+}  // namespace
+
+bool PartitionsRow::IsWholeIdeDisk() const
+{
+    const bool ide = std::find(std::begin(kIdeMajors), std::end(kIdeMajors), major) != std::end(kIdeMajors);
+    return ide && (minor == 0 || minor == 64);
+}
+
+bool PartitionsRow::IsWholeScsiDisk() const
+{
+    return (major == 8 || (major >= 65 && major <= 135)) && minor <= kLargestMinor && minor % 16 == 0;
+}
+
+std::optional<PartitionsRow> ParsePartitionsRow(std::string_view line)
+{
+    PartitionsRow row = {};
+    if (!TakeNumber(line, row.major) || !TakeNumber(line, row.minor) || !TakeNumber(line, row.blocks))
+        return std::nullopt;
+    row.name = TakeField(line);
+    return !row.name.empty() && TakeField(line).empty() ? std::optional(row) : std::nullopt;
+}
+
+bool PartitionsFile::NextRow(PartitionsRow &row)
+{
+    for (std::string_view line; Next(line);) {
+        if (const auto parsed = ParsePartitionsRow(line)) {
+            row = *parsed;
+            return true;
+        }
+    }
+    return false;
+}
+
+int PartitionsFile::Code() const
+{
+    if (!fd_)
+        return ERR_OPEN_FAILED;
+    return lines_.Failed() ? ERR_READ_FAILED : 0;
+}
+
+}  // namespace tavo

@@ -1,0 +1,32 @@
+// A line of the appliance's sfdisk.
+#include "storage/detail/sfdisk_line.h"
+
+#include "core/detail/text_fields.h"
+
+#include <charconv>
+
+namespace tavo {
+namespace {
+
+constexpr size_t kReadable = 63;  // what has ever been read of a line; the name at its end is not needed
+
+template <class Number>
+bool ParseField(std::string_view field, Number &number, int base)
+{
+    const auto [end, error] = std::from_chars(field.data(), field.data() + field.size(), number, base);
+    return error == std::errc{} && end == field.data() + field.size();
+}
+
+}  // namespace
+
+std::optional<PartitionGeometry> ParseSfdiskLine(std::string_view line)
+{
+    const auto fields = SplitFields(line.substr(0, kReadable));
+    PartitionGeometry geometry = {};
+    if (fields.size() < 5 || !ParseField(fields[1], geometry.start, 10) || !ParseField(fields[3], geometry.count, 10) ||
+        !ParseField(fields[4], geometry.type, 16))
+        return std::nullopt;
+    return geometry.start >= 0 && geometry.count >= 0 ? std::optional(geometry) : std::nullopt;
+}
+
+}  // namespace tavo

@@ -1,0 +1,23 @@
+// The USB device that a disk hangs on.
+#ifndef TAVO_STORAGE_DETAIL_USB_ID_H
+#define TAVO_STORAGE_DETAIL_USB_ID_H
+
+#include <optional>
+#include <string_view>
+
+namespace tavo {
+
+struct UsbId {
+    unsigned vendor;
+    unsigned product;
+};
+
+// From /sys, for the disk of kernel name `name`; empty when it hangs on no USB device.
+std::optional<UsbId> UsbIdOfDisk(std::string_view name);
+
+// Four hexadecimal digits and a newline, as the kernel gives an id.
+std::optional<unsigned> ParseUsbId(std::string_view text);
+
+}  // namespace tavo
+
+#endif

@@ -1,0 +1,28 @@
+// Puts a drive to sleep.
+#include "tavo_disk.h"
+
+#include "core/detail/guard.h"
+#include "storage/detail/raw_disk.h"
+
+#include <cstdint>
+
+namespace {
+
+constexpr uint8_t kFlushCache = 0xE7;
+constexpr uint8_t kSleep = 0xE6;
+constexpr uint8_t kOldSleep = 0x99;  // of drives from before the other number
+
+}  // namespace
+
+extern "C" int TAVOIDiskEnterSleep(const char *szPath)
+{
+    if (!szPath)
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        tavo::RawDisk disk;
+        if (const int code = disk.Open(szPath))
+            return Fail(code);
+        disk.DriveCommand(kFlushCache);
+        return disk.DriveCommand(kSleep) || disk.DriveCommand(kOldSleep) ? 0 : -1;
+    });
+}

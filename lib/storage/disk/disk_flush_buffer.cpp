@@ -1,0 +1,33 @@
+// Writes everything that the kernel and the drive hold for a disk.
+#include "tavo_disk.h"
+
+#include "core/detail/guard.h"
+#include "core/detail/log.h"
+#include "storage/detail/raw_disk.h"
+
+#include <linux/fs.h>
+#include <sys/ioctl.h>
+#include <unistd.h>
+
+extern "C" int TAVOIDiskFlushBuffer(const char *szPath)
+{
+    if (!szPath)
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        tavo::RawDisk disk;
+        if (const int code = disk.Open(szPath))
+            return Fail(code);
+        const int fd = disk.Descriptor();
+        ::sync();
+        const bool written = (::fsync(fd) == 0) & (::fdatasync(fd) == 0);
+        ::sync();
+        if (::ioctl(fd, BLKFLSBUF, nullptr) != 0) {
+            LogError("%s:%d ioctl(fd, BLKFLSBUF, NULL) fail");
+            return -1;
+        }
+        ::sync();
+        const int result = disk.Command(DISK_COMMAND_FLUSH, nullptr);
+        ::sync();
+        return written ? result : -1;
+    });
+}

@@ -1,0 +1,30 @@
+// Resets a drive.
+#include "tavo_disk.h"
+
+#include "core/detail/guard.h"
+#include "storage/detail/raw_disk.h"
+
+#include <linux/hdreg.h>
+#include <sys/ioctl.h>
+#include <unistd.h>
+
+namespace {
+
+constexpr unsigned kComesBack = 10;  // seconds
+
+}  // namespace
+
+extern "C" int TAVOIDiskReset(const char *szPath)
+{
+    if (!szPath)
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        tavo::RawDisk disk;
+        if (const int code = disk.Open(szPath))
+            return Fail(code);
+        int result = ::ioctl(disk.Descriptor(), HDIO_DRIVE_RESET, nullptr);
+        ::sleep(kComesBack);
+        result |= ::ioctl(disk.Descriptor(), HDIO_SET_DMA, 1);
+        return result;
+    });
+}

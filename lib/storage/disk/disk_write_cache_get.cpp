@@ -1,0 +1,28 @@
+// Tells whether the write cache of a drive is on.
+#include "tavo_disk.h"
+
+#include "core/detail/guard.h"
+#include "core/detail/log.h"
+#include "storage/detail/caching_page.h"
+#include "storage/detail/raw_disk.h"
+
+extern "C" int TAVODiskWriteCacheGet(const char *szPath)
+{
+    if (!szPath)
+        return static_cast<int>(FailZero(ERR_BAD_PARAMETERS));
+    return Guard([&] {
+        tavo::RawDisk disk;
+        if (const int code = disk.Open(szPath))
+            return static_cast<int>(FailZero(code));
+        if (disk.IsMarvell()) {
+            const auto page = tavo::ReadCachingPage(disk.Descriptor());
+            return page && page->IsOn() ? 1 : 0;
+        }
+        tavo::DrivePage identity = {};
+        if (!disk.Identify(identity)) {
+            LogError("%s:%d %s HDIO_DRIVE_CMD(identify) failed", szPath);
+            return 0;
+        }
+        return tavo::HasWriteCacheOn(identity) ? 1 : 0;
+    });
+}
