@@ -11,6 +11,9 @@
 #include <unistd.h>
 
 namespace enter {
+
+std::string unfinished;
+
 namespace {
 
 std::string ReadLink(const std::string &path)

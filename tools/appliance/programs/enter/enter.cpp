@@ -6,6 +6,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <utility>
 
 #include <sys/stat.h>
 #include <unistd.h>
@@ -20,6 +21,8 @@ void Die(const char *format, ...)
     std::vfprintf(stderr, format, args);
     std::fputc('\n', stderr);
     va_end(args);
+    if (!unfinished.empty())
+        RemoveTree(std::exchange(unfinished, ""));
     std::exit(exit_refused);
 }
 

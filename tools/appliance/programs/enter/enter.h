@@ -20,18 +20,6 @@ struct Bind {
     bool writable;
 };
 
-struct Request {
-    std::string root;      // what `build` made: tree/, manifest, mnt/
-    std::string emulator;  // static user-mode emulator for programs of another architecture; empty: none
-    std::string cwd;       // where the caller stands
-    std::vector<Bind> binds;
-    std::vector<std::string> command;
-    Form form = Form::Any;
-    bool keep = false;
-    char *arguments = nullptr;  // the memory of our own command line
-    size_t arguments_size = 0;
-};
-
 // One line of the manifest: how one path of the private copy comes into being.
 struct Entry {
     char kind;  // d directory, f copied file, l link, r read-only part of the tree, t directory on a file system of its
@@ -40,6 +28,19 @@ struct Entry {
     uid_t uid;
     gid_t gid;
     std::string path;  // relative to the root
+};
+
+struct Request {
+    std::string root;      // what `build` made: tree/, manifest, mnt/
+    std::string emulator;  // static user-mode emulator for programs of another architecture; empty: none
+    std::string cwd;       // where the caller stands
+    std::vector<Entry> entries;
+    std::vector<Bind> binds;
+    std::vector<std::string> command;
+    Form form = Form::Any;
+    bool keep = false;
+    char *arguments = nullptr;  // the memory of our own command line
+    size_t arguments_size = 0;
 };
 
 // options.cpp
@@ -56,6 +57,7 @@ std::vector<std::string> NamesIn(const std::string &path);
 void CopyFile(const std::string &from, const std::string &to);
 void LinkTree(const std::string &from, const std::string &to, const std::string &skip);
 void RemoveTree(const std::string &path);
+extern std::string unfinished;  // a run directory that goes when the program dies of an error
 std::string MakeRunDirectory(const std::string &root);
 
 // command.cpp: runs in the entered root, does not return

@@ -72,7 +72,8 @@ int EnterChroot(const Request &request, std::string *why)
     }
     const std::string tree = request.root + "/tree";
     const std::string place = MakeRunDirectory(request.root);
-    for (const Entry &entry : ReadManifest(request.root)) {
+    unfinished = place;
+    for (const Entry &entry : request.entries) {
         if (entry.kind == 'r')
             LinkTree(tree + "/" + entry.path, place + "/" + entry.path, tree + "/usr/tavo");
         else
@@ -88,6 +89,7 @@ int EnterChroot(const Request &request, std::string *why)
 
     ::prctl(PR_SET_CHILD_SUBREAPER, 1, 0, 0, 0);
     const timespec started = Now();
+    unfinished.clear();
     const pid_t command = ::fork();
     Must(command >= 0, "start", request.command[0]);
     if (command == 0) {

@@ -154,7 +154,7 @@ void MakeOwnMount(const Entry &entry, const std::string &kept, const std::string
 void FillPlace(const Request &request, const std::string &kept, const std::string &place)
 {
     const std::string tree = request.root + "/tree";
-    for (const Entry &entry : ReadManifest(request.root)) {
+    for (const Entry &entry : request.entries) {
         if (entry.kind == 't')
             MakeOwnMount(entry, kept, place);
         MakeEntry(entry, tree, place);

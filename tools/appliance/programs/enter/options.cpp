@@ -92,6 +92,7 @@ Request ReadOptions(int argc, char **argv)
     }
     if (request.root.empty())
         Die("no root: give --root DIR");
+    request.entries = ReadManifest(request.root);
     request.arguments = argv[0];
     request.arguments_size = static_cast<size_t>(argv[argc - 1] + std::strlen(argv[argc - 1]) - argv[0]);
     request.command.assign(argv + i, argv + argc);
