@@ -124,10 +124,12 @@ class Machine:
         try:
             if self.cold:
                 self._start()
-                self._await_hello()
+                self._await(b'H')
             else:
                 self._wake(self._saved_state())
             self._send(b'S', b'%d\n' % time.time() + os.urandom(32))
+            if self._await(b'W') != b'ready':
+                raise Died('it cannot unpack the programs of this tree: ' + self.console.decode(errors='replace')[-500:])
         except BaseException:
             self.close()
             raise
@@ -222,11 +224,11 @@ class Machine:
         return {'driver': 'scsi-hd', 'id': f'bay{bay}', 'bus': 'bus.0', 'drive': f'disk{bay}', 'scsi-id': bay - 1,
                 'lun': 0, 'vendor': 'NASLAB', 'product': f'HD-{bay}', 'ver': '1.0', 'serial': f'SN{bay:04}'}
 
-    def _await_hello(self):
+    def _await(self, wanted):
         while True:
-            kind, _ = self._frame()
-            if kind == b'H':
-                return
+            kind, payload = self._frame()
+            if kind == wanted:
+                return payload
 
     def _saved_state(self):
         """The folder with a machine of this hardware, saved when it had just become ready; made at the first need."""
@@ -250,7 +252,7 @@ class Machine:
         shutil.rmtree(new, ignore_errors=True)
         os.mkdir(new)
         self._start(f'{new}/memory', private=False)
-        self._await_hello()
+        self._await(b'H')
         self.monitor('stop')
         self.monitor('migrate-set-capabilities', capabilities=[{'capability': 'x-ignore-shared', 'state': True}])
         self.monitor('migrate', uri='exec:cat >' + shlex.quote(f'{new}/devices'))

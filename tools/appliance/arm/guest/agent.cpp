@@ -1,7 +1,8 @@
 // Answers the host inside the virtual appliance: takes one job after the other, gives back output and exit status.
 // usage: agent   (started by init)
 //
-// The host sends 'S' (the time in seconds; random bytes follow) once after each start or wake-up, 'R' (a job), 'K' (end
+// The host sends 'S' (the time in seconds; random bytes follow) once after each start or wake-up, answered by 'W',
+// 'R' (a job), 'K' (end
 // the job) and 'Q' (no more jobs). The agent sends 'H' when it is ready, 'o' and 'e' with what the job writes, and 'X'
 // with its outcome.
 #include "channel.h"
@@ -20,15 +21,14 @@ using namespace machine;
 
 namespace {
 
-void WakeUp(const std::string &payload)
+bool WakeUp(const std::string &payload)
 {
     timespec now{};
     now.tv_sec = static_cast<time_t>(atoll(payload.c_str()));
     clock_settime(CLOCK_REALTIME, &now);
     // Every machine that wakes from one saved state would draw the same random numbers.
     std::ofstream("/dev/urandom", std::ios::binary) << payload;
-    if (system("/usr/lib/tavo-machine/wake") != 0)
-        fputs("agent: the shares of the host are not there\n", stderr);
+    return system("/usr/lib/tavo-machine/wake") == 0;
 }
 
 }  // namespace
@@ -45,7 +45,7 @@ int main()
     for (;;) {
         const Frame frame = host.Receive();
         if (frame.type == 'S') {
-            WakeUp(frame.payload);
+            host.Send('W', WakeUp(frame.payload) ? "ready" : "no shares");
         } else if (frame.type == 'R') {
             const Job job = ParseJob(frame.payload);
             const Outcome outcome = RunJob(job, host);
