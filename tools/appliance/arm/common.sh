@@ -3,8 +3,10 @@
 
 arm_tools=$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")
 arm_tree=$(readlink -f "$arm_tools/../../..")
-# Everything that is made lies below one folder. It is safe to delete; several checkouts may share one.
-arm_cache=${TAVO_ARM_CACHE:-$arm_tree/build/appliance/arm}
+# Everything that is made lies below one folder, which is safe to delete. Checkouts may share what Debian's packages
+# alone decide; what this tree's own programs go into is never shared.
+arm_own=$arm_tree/build/appliance/arm
+arm_cache=${TAVO_ARM_CACHE:-$arm_own}
 
 say() { echo "$(basename "$0"): $*" >&2; }
 

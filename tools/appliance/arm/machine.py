@@ -22,7 +22,8 @@ import time
 
 TOOLS = os.path.dirname(os.path.realpath(__file__))
 TREE = os.path.realpath(os.path.join(TOOLS, '../../..'))
-CACHE = os.path.realpath(os.environ.get('TAVO_ARM_CACHE') or os.path.join(TREE, 'build/appliance/arm'))
+OWN = os.path.join(TREE, 'build/appliance/arm')
+CACHE = os.path.realpath(os.environ.get('TAVO_ARM_CACHE') or OWN)
 
 # What a kernel says when something in it went wrong. A process that ran out of memory is not among it.
 FAULT = re.compile(r'Kernel panic|Oops|BUG:|kernel BUG at|Internal error:|Unable to handle kernel|WARNING: CPU:'
@@ -151,8 +152,8 @@ class Machine:
 
     def _start(self, memory_file=None, private=True, incoming=False):
         hardware = self.hardware
-        nothing = os.path.join(CACHE, 'nothing')
-        programs = os.path.join(CACHE, 'programs')
+        nothing = os.path.join(OWN, 'nothing')
+        programs = os.path.join(OWN, 'programs')
         for directory in (nothing, programs):
             os.makedirs(directory, exist_ok=True)
         inherited = []
