@@ -9,10 +9,10 @@
 namespace tavo {
 
 struct UserTexts {
-    std::string_view passwd;
-    std::string_view shadow;
-    std::string_view misc;
-    std::string_view smb;
+    std::string_view passwd = {};
+    std::string_view shadow = {};
+    std::string_view misc = {};
+    std::string_view smb = {};
 };
 
 // The keys and values that adding these accounts would have stored, and those of system accounts, whose lines are kept

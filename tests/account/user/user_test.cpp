@@ -1,0 +1,472 @@
+// The user family: what is refused and what that leaves, names, ids, enumeration, expiry, hashes, follow-ups.
+#include "tavo_user.h"
+
+#include "account/user/user_fixture.h"
+#include "support/captured_log.h"
+#include "support/fault_state.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <functional>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <syslog.h>
+#include <unistd.h>
+
+using namespace std::string_literals;
+using test::AddUser;
+using test::AllFiles;
+using test::Fault;
+using test::GetUser;
+using test::LastFault;
+using test::LineOf;
+using test::MakeUser;
+
+namespace {
+
+std::vector<std::string> Names(const TLIBSZLIST *list)
+{
+    std::vector<std::string> names;
+    for (int i = 0; i < list->nItem; ++i)
+        names.emplace_back(SzTLIBSzListGet(list, i));
+    return names;
+}
+
+TEST(UserName, Rule)
+{
+    const std::string sixty_four = [] {
+        std::string text;
+        for (int i = 0; i < 64; ++i)
+            text += "\xE2\x82\xAC";
+        return text;
+    }();
+    const struct {
+        std::string name;
+        int good;
+    } rows[] = {
+        {"a", 1},
+        {"A.b-c_d 9", 1},
+        {sixty_four, 1},
+        {sixty_four + "a", 0},
+        {std::string(64, 'a'), 1},
+        {std::string(65, 'a'), 0},
+        {"", 0},
+        {"-a", 0},
+        {" a", 0},
+        {"a ", 0},
+        {"a:b", 0},
+        {"a\\b", 0},
+        {"a\nb", 0},
+        {"a,b", 0},
+        {"a/b", 0},
+        {"a\x7F", 0},
+        {"..", 1},
+        {"a\xC3\xA9", 1},
+        {"a@b", 0},
+        {"1000", 1},
+    };
+    for (const auto &row : rows)
+        EXPECT_EQ(BlTLIBIsUserName(row.name.c_str()), row.good) << row.name;
+    EXPECT_EQ(BlTLIBIsUserName(nullptr), 0);
+}
+
+TEST(UserRecord, HoldsEveryFieldAndRefillsFromItself)
+{
+    TAVOUSER *user = nullptr;
+    ASSERT_EQ(TAVOUserAlloc(&user, "n", "p", 1, 2, "d", "h", "s", 3, 4, "m", 5), 0);
+    ASSERT_EQ(TAVOUserAlloc(&user, user->szMail, user->szName, 10, 20, user->szShell, user->szDesc, user->szPasswd, 30,
+                            0, user->szHome, 50),
+              0);
+    EXPECT_STREQ(user->szName, "m");
+    EXPECT_STREQ(user->szPasswd, "n");
+    EXPECT_STREQ(user->szDesc, "s");
+    EXPECT_STREQ(user->szHome, "d");
+    EXPECT_STREQ(user->szShell, "p");
+    EXPECT_STREQ(user->szMail, "h");
+    EXPECT_EQ(user->nUid + user->nGid + user->nExpired + user->nPrivilege, 10 + 20 + 30 + 50);
+    EXPECT_EQ(user->fCannotChgPasswd, 0);
+    EXPECT_EQ(user->nKind, TAVO_USER_KIND_LOCAL);
+    ASSERT_EQ(TAVOUserAlloc(&user, "DOM\\u", nullptr, 0, 0, nullptr, nullptr, nullptr, 0, 7, nullptr, 0), 0);
+    EXPECT_EQ(user->nKind, TAVO_USER_KIND_DOMAIN);
+    EXPECT_EQ(user->fCannotChgPasswd, 1);
+    EXPECT_STREQ(user->szMail, "");
+    EXPECT_EQ(TAVOUserAlloc(&user, "", "p", 1, 2, "d", "h", "s", 3, 4, "m", 5), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_alloc"}));
+    EXPECT_STREQ(user->szName, "DOM\\u") << "a refused refill leaves the record";
+    TAVOUserFree(user);
+    TAVOUserFree(nullptr);
+}
+
+// Each refused change gives its code and leaves every file as it was.
+TEST(UserSet, RefusalsLeaveTheFiles)
+{
+    ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
+    const auto before = AllFiles();
+    const std::string huge(4096, 'x');
+    const struct {
+        std::optional<std::string> old_name;
+        test::UserTexts texts;
+        int code;
+    } rows[] = {
+        {{}, {.name = "ALICE"}, ERR_USER_EXISTS},
+        {{}, {.name = "a:b"}, ERR_INVALID_USERNAME},
+        {{}, {.name = ".."}, ERR_INVALID_USERNAME},
+        {{}, {.name = "."}, ERR_INVALID_USERNAME},
+        {{}, {.name = "bad\xFF"}, ERR_INVALID_USERNAME},
+        {{}, {.name = "x\nroot::0:0::/:/bin/sh"}, ERR_INVALID_USERNAME},
+        {{}, {.name = "eve", .description = "a\nroot::0:0::/:/bin/sh"}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .description = "a\rb"}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .description = huge}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .home = "/a:b"}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .home = "/a\nb"}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .home = "/homes/../etc"}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .home = "homes"}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .home = "/" + huge}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .shell = "/bin/sh:x"}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .shell = "/bin/sh\n"}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .mail = "a:b"}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .mail = "a\nb"}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .mail = "\x01"}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .uid = -2}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .password = huge}, ERR_BAD_PARAMETERS},
+        {"nobody here", {.name = "eve"}, ERR_NO_SUCH_USER},
+        {"alice", {.name = "Admin"}, ERR_USER_EXISTS},
+        {"root", {.name = "toor"}, ERR_USER_DB_DELETE},
+        {"ADMIN", {.name = "boss"}, ERR_USER_DB_DELETE},
+    };
+    for (const auto &row : rows) {
+        EXPECT_EQ(test::SetUser(row.old_name, MakeUser(row.texts).get()), row.code)
+            << (row.old_name ? *row.old_name : "-") << " " << row.texts.name.substr(0, 40);
+        ASSERT_EQ(AllFiles(), before) << row.texts.name.substr(0, 40);
+    }
+    EXPECT_EQ(test::DeleteUser("Root"), ERR_USER_DB_DELETE);
+    EXPECT_EQ(test::DeleteUser("aDMIN"), ERR_USER_DB_DELETE);
+    EXPECT_EQ(test::DeleteUser("nobody here"), ERR_NO_SUCH_USER);
+    EXPECT_EQ(AllFiles(), before);
+
+    const TAVOUSER *users[] = {nullptr};
+    const char *names[] = {nullptr};
+    EXPECT_EQ(TAVOUserSet(nullptr, users, 1), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_set"}));
+    EXPECT_EQ(TAVOUserSet(names, users, -1), -1);
+    EXPECT_EQ(TAVOUserSet(nullptr, nullptr, 0), 0);
+    EXPECT_EQ(TAVOUserSetOne("alice", nullptr), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_set_one"}));
+    EXPECT_EQ(TAVOUserDelete(nullptr, 1), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_delete"}));
+    EXPECT_EQ(AllFiles(), before);
+}
+
+// One bad entry among good ones: it is logged and skipped, the rest is applied in one rewrite.
+TEST(UserSet, BatchSkipsWhatFails)
+{
+    test::CapturedLog log;
+    const test::User good = MakeUser({.name = "one"});
+    const test::User bad = MakeUser({.name = "two:"});
+    const test::User also = MakeUser({.name = "three"});
+    const test::User renamed = MakeUser({.name = "four"});
+    const TAVOUSER *users[] = {good.get(), bad.get(), also.get(), good.get(), renamed.get(), renamed.get()};
+    const char *old_names[] = {nullptr, nullptr, nullptr, nullptr, "guest", "GUEST"};
+    EXPECT_EQ(TAVOUserSet(old_names, users, 6), 0);
+    EXPECT_EQ(TLIBErrGet(), ERR_KEY_EXISTS) << "of the last entry that failed";
+    EXPECT_TRUE(GetUser("one") && GetUser("three") && GetUser("four"));
+    EXPECT_FALSE(GetUser("guest"));
+    EXPECT_EQ(LineOf("/etc/passwd", "four"), "four:x:1025:100::/var/services/homes/four:/bin/csh");
+
+    std::vector<std::string> notices;
+    for (const test::LoggedLine &line : log.Lines())
+        if (line.priority == LOG_NOTICE)
+            notices.push_back(line.text.substr(line.text.find(' ') + 1));
+    EXPECT_EQ(notices, (std::vector<std::string>{"Failed to set user [two:], tavoerr=0x1A00",
+                                                 "Failed to set user [one], tavoerr=0x1C00",
+                                                 "Failed to set user [four], tavoerr=0x2100"}));
+    const auto says = [&](const std::string &text) {
+        return std::any_of(log.Lines().begin(), log.Lines().end(),
+                           [&](const test::LoggedLine &line) { return line.text.ends_with(text); });
+    };
+    EXPECT_TRUE(says(" Duplicated key:[GUEST]"));
+    EXPECT_EQ(test::SetUser("ghost", renamed.get()), ERR_NO_SUCH_USER);
+    EXPECT_TRUE(says(" szOldName=[ghost] is NOT EXIST."));
+}
+
+TEST(UserSet, UidsOfTheRange)
+{
+    const auto current = [](int32_t uid) {
+        TAVOBDB *store = TAVOBDbOpen(TAVO_USER_DB_UID, O_RDWR, 1);
+        ASSERT_NE(store, nullptr);
+        EXPECT_EQ(TAVOBDbSet(store, TAVO_BDB_KEY_UID, TAVO_BDB_KEY_UID_LEN, &uid, 4), 0);
+        EXPECT_EQ(TAVOBDbClose(store), 0);
+    };
+    ASSERT_TRUE(GetUser("admin"));
+    current(3072);
+    EXPECT_EQ(AddUser({.name = "a"}), 0);
+    EXPECT_EQ(GetUser("a")->nUid, 1026) << "behind 3072 comes 1024; admin and guest have two of them";
+    current(500);
+    EXPECT_EQ(AddUser({.name = "b"}), 0);
+    EXPECT_EQ(GetUser("b")->nUid, 1027);
+    current(3070);
+    EXPECT_EQ(AddUser({.name = "c"}), 0);
+    EXPECT_EQ(GetUser("c")->nUid, 3071) << "a counter that a program stored is not lost";
+
+    // All 2,049 ids: five are taken, the sixth of the last batch finds none.
+    std::vector<test::User> users;
+    std::vector<const TAVOUSER *> records;
+    for (int i = 0; i < 2049 - 5; ++i) {
+        users.push_back(MakeUser({.name = "u" + std::to_string(i)}));
+        records.push_back(users.back().get());
+    }
+    std::vector<const char *> none(records.size());
+    TLIBErrSet(ERR_SUCCESS);
+    ASSERT_EQ(TAVOUserSet(none.data(), records.data(), int(records.size())), 0);
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    EXPECT_EQ(AddUser({.name = "full"}), ERR_TOO_MANY_USERS);
+    EXPECT_EQ(test::Lines(test::FileText("/etc/passwd")).size(), 2049u + 7);
+    EXPECT_EQ(test::DeleteUser("u1000"), 0);
+    EXPECT_EQ(AddUser({.name = "again"}), 0);
+    EXPECT_EQ(AddUser({.name = "full"}), ERR_TOO_MANY_USERS);
+
+    const auto before = AllFiles();
+    ASSERT_EQ(::unlink("/tmp/.db.user.seal"), 0);
+    EXPECT_EQ(AddUser({.name = "full"}), ERR_TOO_MANY_USERS) << "also in stores that were built anew";
+    EXPECT_EQ(AllFiles(), before);
+}
+
+TEST(UserEnum, ListsByFlagAndText)
+{
+    for (const char *name : {"Zoe", "anna", "Annika", "bob"})
+        ASSERT_EQ(AddUser({.name = name}), 0);
+    ASSERT_EQ(AddUser({.name = "service", .uid = 900}), 0);
+    TLIBSZLIST *list = PslTLIBSzListAlloc(64);
+    using List = std::vector<std::string>;
+    const struct {
+        std::function<int()> list;
+        List names;
+    } rows[] = {
+        {[&] { return TAVOUserEnum(&list, 1); }, {"admin", "anna", "Annika", "bob", "guest", "Zoe"}},
+        {[&] { return TAVOUserEnum(&list, 3); }, {"admin", "anna", "Annika", "bob", "guest", "Zoe"}},
+        {[&] { return TAVOUserEnum(&list, 2); }, {}},
+        {[&] { return TAVOUserEnum(&list, 0xFF9); }, {"admin", "anna", "Annika", "bob", "guest", "Zoe"}},
+        {[&] { return TAVOUserEnumByPrefix(&list, 1, "aNN"); }, {"anna", "Annika"}},
+        {[&] { return TAVOUserEnumBySubstr(&list, 1, "O"); }, {"bob", "Zoe"}},
+        {[&] { return TAVOUserEnumBySubstr(&list, 1, ""); }, {"admin", "anna", "Annika", "bob", "guest", "Zoe"}},
+    };
+    for (const auto &row : rows) {
+        TLIBSzListRemoveAll(list);
+        EXPECT_EQ(row.list(), int(row.names.size()));
+        EXPECT_EQ(Names(list), row.names);
+    }
+    test::WriteFile("/usr/tavo/etc/duser_used", "DOM\\joe\nnot one\nDOM\\ann\n");
+    TLIBSzListRemoveAll(list);
+    EXPECT_EQ(TAVOUserEnum(&list, TAVO_USER_LOCAL | TAVO_USER_DOMAIN_USED), 8);
+    EXPECT_EQ(Names(list)[0], "DOM\\joe") << "those in use come first";
+    EXPECT_EQ(TAVOUserTotalNum(1), 6);
+    for (const int flags : {0, 8}) {
+        EXPECT_EQ(TAVOUserEnum(&list, flags), -1);
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_enum"}));
+    }
+    EXPECT_EQ(TAVOUserEnumByPrefix(&list, 1, nullptr), -1);
+    TLIBSzListFree(list);
+
+    const char *const members[] = {"BOB", "ghost", "", "Zoe", nullptr};
+    char text[8];
+    EXPECT_EQ(TAVOUserGetValidUserList(members, nullptr, 0), 8);
+    EXPECT_EQ(TAVOUserGetValidUserList(members, text, 7), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_NOT_ENOUGH_MEMORY, "user_get_valid_user_list"}));
+    EXPECT_EQ(TAVOUserGetValidUserList(members, text, 8), 8);
+    EXPECT_STREQ(text, "BOB,Zoe");
+
+    EXPECT_EQ(TAVOUserPrivilegeGet("ADMIN"), 0x3F);
+    EXPECT_EQ(TAVOUserPrivilegeGet("Guest"), 0);
+    EXPECT_EQ(TAVOUserPrivilegeGet("DOM\\joe"), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_NO_SUCH_USER, "user_get"}));
+
+    TAVOUSER *user = nullptr;
+    EXPECT_EQ(TAVOUserGetByUID(900, &user), 0);
+    EXPECT_STREQ(user->szName, "service");
+    EXPECT_EQ(TAVOUserGetByUID(901, &user), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_NO_SUCH_USER, "user_get_by_uid"}));
+    EXPECT_STREQ(user->szName, "service") << "a failure leaves the record";
+    TAVOUserFree(user);
+}
+
+TEST(UserLimit, MaxAccountsLessAccounts)
+{
+    const struct {
+        const char *line;
+        int limit;
+        int code;
+    } rows[] = {
+        {"maxaccounts=\"12\"\nsupportguest=no\n", 11, 0},  // admin alone: the guest does not count without support
+        {"maxaccounts=\"12\"\nsupportguest=yes\n", 10, 0}, {"maxaccounts=\nsupportguest=yes\n", 0, 0},
+        {"maxaccounts=\"1\"\nsupportguest=yes\n", -2, 0},  {"maxdisks=4\n", -1, ERR_KEY_NOT_FOUND},
+        {"maxaccounts=many\n", -1, ERR_FORMAT_ERROR},
+    };
+    for (const auto &row : rows) {
+        test::WriteFile("/etc.defaults/tavoinfo.conf", row.line);
+        test::ForgetFault();
+        EXPECT_EQ(TAVOConfGetUserLimit(), row.limit) << row.line;
+        EXPECT_EQ(row.limit == -1 ? TLIBErrGet() : 0, row.code) << row.line;
+    }
+    ASSERT_EQ(::unlink("/etc.defaults/tavoinfo.conf"), 0);
+    EXPECT_EQ(TAVOConfGetUserLimit(), -1);
+}
+
+TEST(UserExpiry, DatesAndDays)
+{
+    const test::User user = MakeUser({.name = "a", .expire = -7});
+    char text[16];
+    const struct {
+        const char *date;
+        int day;
+        const char *shown;
+    } rows[] = {
+        {"2023/11/05", 19666, "2023/11/5"}, {"1969/12/31", 24855, "2038/1/19"},
+        {"1970/01/03", 2, "1970/1/3"},      {"1970/01/01", 0, ""},
+        {"2100/02/28", 47540, "2100/2/28"}, {"2024/2/29", 19782, "2024/2/29"},
+    };
+    for (const char *zone : {"UTC0", "EST5EDT,M3.2.0,M11.1.0", "LINT-14"}) {
+        ::setenv("TZ", zone, 1);
+        ::tzset();
+        for (const auto &row : rows) {
+            ASSERT_EQ(TAVOUserExpiredDateFill(user.get(), row.date), 0) << row.date;
+            EXPECT_EQ(user->nExpired, row.day) << row.date << " " << zone;
+            EXPECT_EQ(TAVOUserExpiredDateGet(user.get(), text, sizeof text), 0);
+            EXPECT_STREQ(text, row.shown) << row.date;
+        }
+    }
+    user->nExpired = 5;
+    for (const char *bad : {"", "yesterday", "2023-11-05", "2023/13/01", "2023/02/30", "2023/11/05x"}) {
+        EXPECT_EQ(TAVOUserExpiredDateFill(user.get(), bad), -1) << bad;
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_expired_date_fill"}));
+        EXPECT_EQ(user->nExpired, 5);
+    }
+    EXPECT_EQ(TAVOUserExpiredDateGet(user.get(), text, 8), -1) << "1970/1/6 has eight characters";
+    EXPECT_EQ(LastFault(), (Fault{ERR_NOT_ENOUGH_MEMORY, "user_expired_date_get"}));
+
+    EXPECT_EQ(AddUser({.name = "gone", .expire = 1000}), 0);
+    EXPECT_EQ(AddUser({.name = "stays", .expire = -1}), 0);
+    EXPECT_EQ(TAVOUserCheckExpired("GONE"), 1);
+    EXPECT_EQ(TAVOUserCheckExpired("stays"), 0);
+    EXPECT_EQ(TAVOUserCheckExpired("ghost"), -1);
+}
+
+// Hashes that other systems publish for these passwords.
+TEST(SambaHashes, KnownPasswords)
+{
+    const struct {
+        const char *password;
+        const char *lm;
+        const char *nt;
+    } rows[] = {
+        {"", "AAD3B435B51404EEAAD3B435B51404EE", "31D6CFE0D16AE931B73C59D7E0C089C0"},
+        {"password", "E52CAC67419A9A224A3B108F3FA6CB6D", "8846F7EAEE8FB117AD06BDD830B7586C"},
+        {"SecREt01", "FF3750BCC2B22412C2265B23734E0DAC", "CD06CA7C7E10C99B1D33B7485A2ED808"},
+    };
+    const auto hex = [](const unsigned char *hash) {
+        std::string text;
+        char digits[3];
+        for (int i = 0; i < 16; ++i) {
+            std::snprintf(digits, sizeof digits, "%02X", hash[i]);
+            text += digits;
+        }
+        return text;
+    };
+    unsigned char hash[16];
+    for (const auto &row : rows) {
+        EXPECT_EQ(TLIBSmbLmHash(row.password, hash), 0);
+        EXPECT_EQ(hex(hash), row.lm) << row.password;
+        EXPECT_EQ(TLIBSmbMd4Hash(row.password, hash), 0);
+        EXPECT_EQ(hex(hash), row.nt) << row.password;
+    }
+    EXPECT_EQ(TLIBSmbLmHash(nullptr, hash), -1);
+    EXPECT_EQ(TLIBSmbMd4Hash("x", nullptr), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "smb_md4_hash"}));
+    std::string salts;
+    for (int i = 0; i < 64; ++i)
+        salts += TAVOUserRandomNumMap2Seed(-i - 64);
+    EXPECT_EQ(salts, "0123456789ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz./");
+}
+
+TEST(UserFollowUp, FoldersListsAndServices)
+{
+    test::WriteFile("/etc/tavoinfo.conf", "userHomeEnable=\"yes\"\nrunsamba=\"yes\"\n");
+    test::WriteFile("/etc/ftpchroot", "carl\nAlice\n");
+    test::WriteFile("/usr/tavo/etc/smb.conf", "[s]\nvalid users = alice, @alice, bob\n");
+    test::WriteFile("/usr/tavo/etc/afpd.conf", "- -uamlist uams_noguest.so,uams_dhx.so\n", 0640);
+    test::WriteFile("/usr/tavo/etc/netbkp.users", "alice\nadmin\n");
+    test::WriteFile("/etc/rsyncd.secrets", "alice:old\nother:secret\n", 0600);
+    test::WriteFile("/usr/tavo/etc/share.conf", "[homes]\npath=/volume1/homes\n");
+    ASSERT_EQ(::mkdir("/volume1", 0755), 0);
+    ASSERT_EQ(::mkdir("/volume1/homes", 0755), 0);
+    ASSERT_EQ(::symlink("/volume1/homes", "/var/services/homes"), 0);
+
+    ASSERT_EQ(AddUser({.name = "alice", .password = "pw"}), 0);
+    struct stat st;
+    ASSERT_EQ(::stat("/volume1/homes/alice", &st), 0);
+    EXPECT_EQ(st.st_uid, 1027u);
+    EXPECT_EQ(st.st_gid, 100u);
+    EXPECT_EQ(st.st_mode & 07777, 0755u);
+    EXPECT_EQ(test::ReadFile("/etc/rsyncd.secrets"), "alice:pw\nother:secret\n");
+    test::WriteFile("/volume1/homes/alice/letter", "mine\n");
+
+    ASSERT_EQ(test::Rename("alice", "carol"), 0);
+    EXPECT_EQ(test::ReadFile("/volume1/homes/carol/letter"), "mine\n");
+    EXPECT_NE(::access("/volume1/homes/alice", F_OK), 0);
+    EXPECT_EQ(test::ReadFile("/etc/ftpchroot"), "carl\ncarol\n");
+    EXPECT_EQ(test::ReadFile("/usr/tavo/etc/smb.conf"), "[s]\nvalid users = carol, @alice, bob\n");
+    EXPECT_EQ(test::ReadFile("/etc/rsyncd.secrets"), "carol:pw\nother:secret\n");
+    EXPECT_EQ(test::ReadFile("/usr/tavo/etc/netbkp.users"), "carol\nadmin\n");
+
+    // A renamed user never gets, or loses, a folder that is somebody else's.
+    ASSERT_EQ(::mkdir("/volume1/homes/dave", 0700), 0);
+    ASSERT_EQ(test::Rename("carol", "dave"), 0);
+    EXPECT_EQ(test::ReadFile("/volume1/homes/carol/letter"), "mine\n");
+    ASSERT_EQ(test::Rename("dave", "carol"), 0);
+
+    const test::User guest = MakeUser({.name = "guest", .password = ""});
+    EXPECT_EQ(test::SetUser("guest", guest.get()), 0);
+    EXPECT_EQ(test::ReadFile("/usr/tavo/etc/afpd.conf"), "- -uamlist uams_guest.so,uams_dhx.so\n");
+    EXPECT_EQ(test::SetUser("guest", MakeUser({.name = "guest", .password = "closed"}).get()), 0);
+    EXPECT_EQ(test::ReadFile("/usr/tavo/etc/afpd.conf"), "- -uamlist uams_noguest.so,uams_dhx.so\n");
+    ASSERT_EQ(::unlink("/usr/tavo/etc/afpd.conf"), 0);
+    EXPECT_EQ(test::SetUser("guest", MakeUser({.name = "guest"}).get()), ERR_FILE_NOT_FOUND) << "set, but applied";
+
+    // Deleting follows no link that a user left in the home folder.
+    test::WriteFile("/volume1/precious", "keep\n");
+    ASSERT_EQ(::symlink("/volume1", "/volume1/homes/carol/link"), 0);
+    ASSERT_EQ(test::DeleteUser("carol"), 0);
+    EXPECT_NE(::access("/volume1/homes/carol", F_OK), 0);
+    EXPECT_EQ(test::ReadFile("/volume1/precious"), "keep\n");
+    EXPECT_TRUE(std::filesystem::is_empty("/volume1/@tmp"));
+    EXPECT_EQ(test::ReadFile("/usr/tavo/etc/smb.conf"), "[s]\nvalid users = @alice, bob\n");
+    EXPECT_EQ(test::ReadFile("/etc/rsyncd.secrets"), "other:secret\n");
+}
+
+TEST(UserSetPasswd, StoresOnlyWhatIsAHash)
+{
+    ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
+    const auto before = AllFiles();
+    const test::User alice = MakeUser({.name = "alice"});
+    const test::User ghost = MakeUser({.name = "ghost"});
+    const std::string hex(32, 'A');
+    const auto set = [&](const TAVOUSER *user, const char *hash, const char *lm, const char *nt) {
+        TLIBErrSet(ERR_SUCCESS);
+        EXPECT_EQ(TAVOUserSetPasswd(&user, &hash, &lm, &nt, 1), 0);
+        return TLIBErrGet();
+    };
+    EXPECT_EQ(set(alice.get(), "a:b", hex.c_str(), hex.c_str()), ERR_BAD_PARAMETERS);
+    EXPECT_EQ(set(alice.get(), "a\nb", hex.c_str(), hex.c_str()), ERR_BAD_PARAMETERS);
+    EXPECT_EQ(set(alice.get(), "$1$a", "short", hex.c_str()), ERR_BAD_PARAMETERS);
+    EXPECT_EQ(set(alice.get(), "$1$a", hex.c_str(), (hex + "A").c_str()), ERR_BAD_PARAMETERS);
+    EXPECT_EQ(set(ghost.get(), "$1$a", hex.c_str(), hex.c_str()), ERR_NO_SUCH_USER);
+    EXPECT_EQ(set(nullptr, "$1$a", hex.c_str(), hex.c_str()), ERR_SUCCESS);
+    EXPECT_EQ(AllFiles(), before);
+    EXPECT_EQ(set(alice.get(), "$1$a", hex.c_str(), hex.c_str()), ERR_SUCCESS);
+    EXPECT_STREQ(GetUser("alice")->szPasswd, "$1$a");
+    EXPECT_EQ(TAVOUserSetPasswd(nullptr, nullptr, nullptr, nullptr, 1), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_set_passwd"}));
+}
+
+}  // namespace
