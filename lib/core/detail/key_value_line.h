@@ -11,7 +11,7 @@ inline constexpr std::string_view kWhiteSpace = "\t\n\r ";
 
 constexpr bool IsWhiteSpace(char byte)
 {
-    return kWhiteSpace.find(byte) != std::string_view::npos;
+    return byte == '\t' || byte == '\n' || byte == '\r' || byte == ' ';
 }
 
 // Takes white space off both ends, then one pair of double quotes that encloses the rest.
@@ -34,17 +34,24 @@ std::string_view LineKey(std::string_view line);
 // The value of a line that sets a key.
 std::string_view LineValue(std::string_view line);
 
-// Whether a line sets the key. The first byte that may belong to a key decides most lines.
+// What may stand in front of a key in its line.
+constexpr bool IsAroundKey(char byte)
+{
+    return IsWhiteSpace(byte) || byte == '=' || byte == '"';
+}
+
+// Whether a line sets the key. Reading a file is asking this of every line: the first byte that may belong to a key
+// answers for most of them.
 inline bool LineSetsKey(std::string_view line, std::string_view key)
 {
-    constexpr std::string_view around_key = "=\"\t\n\r ";
     if (key.empty())
         return false;
-    if (around_key.find(key[0]) == around_key.npos) {
+    if (!IsAroundKey(key[0])) {
         size_t at = 0;
-        while (at < line.size() && around_key.find(line[at]) != around_key.npos)
+        while (at < line.size() && IsAroundKey(line[at]))
             ++at;
-        if (at == line.size() || line[at] != key[0])
+        if (at == line.size() || line[at] != key[0] || line.size() - at < key.size() ||
+            line[at + key.size() - 1] != key.back())
             return false;
     }
     return LineKey(line) == key;
