@@ -13,19 +13,37 @@ namespace {
 
 static_assert(std::endian::native == std::endian::little, "the words of a key are read as they stand in memory");
 
+template <class Word>
+Word Load(const char *at)
+{
+    Word word;
+    std::memcpy(&word, at, sizeof word);
+    return word;
+}
+
+// The one to three bytes behind the last whole word, as a word; 0 when there are none.
+uint32_t LastWord(std::string_view key)
+{
+    const size_t left = key.size() % 4;
+    const char *at = key.data() + (key.size() - left);
+    if (key.size() >= 4)
+        return static_cast<uint32_t>(uint64_t{Load<uint32_t>(at + left - 4)} >> (32 - 8 * left));
+    uint32_t word = 0;
+    for (size_t i = 0; i < left; ++i)
+        word |= uint32_t{static_cast<unsigned char>(at[i])} << (8 * i);
+    return word;
+}
+
 uint32_t WordSum(std::string_view key)
 {
-    uint32_t sum = 0;
-    size_t left = key.size();
+    uint32_t sum = LastWord(key);
     const char *at = key.data();
-    for (; left >= 4; left -= 4, at += 4) {
-        uint32_t word;
-        std::memcpy(&word, at, 4);
-        sum += word;
+    size_t left = key.size();
+    for (; left >= 8; left -= 8, at += 8) {
+        const auto words = Load<uint64_t>(at);
+        sum += static_cast<uint32_t>(words) + static_cast<uint32_t>(words >> 32);
     }
-    uint32_t last = 0;
-    std::memcpy(&last, at, left);
-    return sum + last;
+    return left >= 4 ? sum + Load<uint32_t>(at) : sum;
 }
 
 // A division by a number known to the compiler is a multiplication; these are the tables that every hash begins with.
@@ -47,14 +65,38 @@ uint32_t Modulo(uint32_t sum, uint32_t slots)
     }
 }
 
+const char *StringEnd(const TLIBSZHASH *hash)
+{
+    return reinterpret_cast<const char *>(hash->slots + hash->nSlot) + hash->nStrSize;
+}
+
 int Next(const TLIBSZHASH *hash, int slot)
 {
     return slot + 1 == hash->nSlot ? 0 : slot + 1;
 }
 
-bool Holds(const TLIBSZHASHSLOT &slot, std::string_view key)
+// Whether two stretches of `bytes` readable bytes are the same. Keys are short: a call of memcmp costs more than they do.
+bool SameBytes(const char *a, const char *b, size_t bytes)
 {
-    return std::strcmp(slot.pszKey, key.data()) == 0;
+    if (bytes < 8) {
+        while (bytes > 0 && a[bytes - 1] == b[bytes - 1])
+            --bytes;
+        return bytes == 0;
+    }
+    for (size_t i = 0; i + 8 <= bytes; i += 8) {
+        if (Load<uint64_t>(a + i) != Load<uint64_t>(b + i))
+            return false;
+    }
+    return Load<uint64_t>(a + bytes - 8) == Load<uint64_t>(b + bytes - 8);
+}
+
+// A key is compared with its NUL. What stands behind a shorter one is in the block too, except at its very end.
+bool Holds(const TLIBSZHASHSLOT &slot, std::string_view key, const char *end)
+{
+    const size_t bytes = key.size() + 1;
+    if (static_cast<size_t>(end - slot.pszKey) < bytes)
+        return false;
+    return SameBytes(slot.pszKey, key.data(), bytes);
 }
 
 // The place of a key that the hash does not hold, in a table without removed pairs.
@@ -97,11 +139,12 @@ int FindPair(const TLIBSZHASH *hash, std::string_view key) noexcept
     const int home = HomeSlot(key, hash->nSlot);
     if (home < 0)
         return -1;
+    const char *end = StringEnd(hash);
     int slot = home;
     do {
         const TLIBSZHASHSLOT &at = hash->slots[slot];
         if (IsPair(at)) {
-            if (Holds(at, key))
+            if (Holds(at, key, end))
                 return slot;
         } else if (IsNeverUsed(at)) {
             return -1;
@@ -116,8 +159,9 @@ Place FindPlace(const TLIBSZHASH *hash, std::string_view key) noexcept
     const int home = HomeSlot(key, hash->nSlot);
     if (home < 0)
         return {};
+    const char *end = StringEnd(hash);
     const TLIBSZHASHSLOT &first = hash->slots[home];
-    if (IsNeverUsed(first) || (IsPair(first) && Holds(first, key)))
+    if (IsNeverUsed(first) || (IsPair(first) && Holds(first, key, end)))
         return {home, -1};
     Place place;
     if (!IsPair(first))
@@ -125,7 +169,7 @@ Place FindPlace(const TLIBSZHASH *hash, std::string_view key) noexcept
     for (int slot = Next(hash, home); slot != home; slot = Next(hash, slot)) {
         const TLIBSZHASHSLOT &at = hash->slots[slot];
         if (IsPair(at)) {
-            if (Holds(at, key))
+            if (Holds(at, key, end))
                 return {slot, -1};
         } else if (!IsNeverUsed(at)) {
             if (place.usual < 0)
