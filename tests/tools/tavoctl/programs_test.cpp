@@ -89,6 +89,17 @@ TEST(TavoctlPrograms, LockRunHoldsExactlyItsLocksWhileTheProgramRuns)
     EXPECT_EQ(dir.Names(), (std::vector<std::string>{"begun", "end", "later"}));
 }
 
+TEST(TavoctlPrograms, WhoWatchesSeesWhatIsWaitedFor)
+{
+    if (test::RootLacks("pts"))
+        GTEST_SKIP() << "no terminals here";
+    ASSERT_EQ(ErrTLIBFileLock(TAVO_LOCK_USER | at_once, 0), 0);
+    const test::Ran ran = test::TavoctlAtTerminal({"lock", "run", "--timeout", "1", "pw", "--", "true"});
+    EXPECT_EQ(ran.status, 4);
+    EXPECT_THAT(ran.out, HasSubstr("waiting for the lock pw: 1 s left"));
+    EXPECT_EQ(ErrTLIBFileUnlock(TAVO_LOCK_USER), 0);
+}
+
 TEST(TavoctlPrograms, SharedLocksAreShared)
 {
     EXPECT_EQ(Tavoctl({"lock", "run", "--shared", "pw", "--", "/usr/bin/tavoctl", "lock", "run", "--shared",
