@@ -200,7 +200,7 @@ TAVO_API char *TAVODiskGetDevnameFromFd(int fd);
 
 /* Gives the drive model of the whole disk szPath, as it stands in /sys/block/NAME/device/model; a longer text is cut.
  * Returns 0, or -1, logged: the disk cannot be opened, there is no model; with ERR_BAD_PARAMETERS for a NULL argument, a
- * size below 1 or a path that does not end in a plain name. */
+ * size below 1 or a path that is not "/dev/" and a plain name. */
 TAVO_API int TAVOLnxDiskGetModel(const char *szPath, char *szModel, int cbModel);
 
 /* Tells whether the disk hangs on a controller that takes raw commands through marvell_command_interface: 1 or 0; -1,

@@ -68,6 +68,9 @@ void PrintLine(const std::string &disk, const Partition &partition)
 int RunList(const Options &options)
 {
     const BlockTarget disk(options.path, OpenMode::read);
+    // On a blank disk too the partition asked for is just not there.
+    if (options.number && !HasSignature(disk.Read(0)))
+        return 1;
     bool any = options.number == 0;
     for (const Partition &partition : ReadPartitions(disk)) {
         if (options.number && partition.number != options.number)

@@ -13,7 +13,7 @@
 
 extern "C" int TAVOLnxDiskGetModel(const char *szPath, char *szModel, int cbModel)
 {
-    if (!szPath || !szModel || cbModel < 1 || !tavo::IsDeviceName(tavo::LastPart(szPath)))
+    if (!szPath || !szModel || cbModel < 1 || !tavo::IsDevicePath(szPath))
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         if (!tavo::OpenFd(szPath, O_RDONLY)) {

@@ -1,0 +1,552 @@
+// Which disks there are, where they sit and what they are.
+#include "tavo_appliance.h"
+#include "tavo_disk.h"
+
+#include "support/captured_log.h"
+#include "support/captures.h"
+#include "support/device_tree.h"
+#include "support/fault_state.h"
+#include "support/hostile_names.h"
+#include "support/recorded_calls.h"
+#include "support/recorded_commands.h"
+
+#include <gmock/gmock.h>
+
+#include <cerrno>
+#include <cstddef>
+#include <cstring>
+#include <memory>
+#include <random>
+
+#include <fcntl.h>
+#include <linux/fs.h>
+#include <linux/hdreg.h>
+#include <sys/ioctl.h>
+#include <sys/stat.h>
+#include <syslog.h>
+#include <unistd.h>
+
+using test::Fault;
+using test::LastFault;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+namespace {
+
+static_assert(offsetof(DISKINFO, szPath) == 16 && offsetof(DISKINFO, szModel) == 144);
+static_assert(offsetof(DISKINFO, cbDisk) == 272 && offsetof(DISKINFO, nTemperature) == 280 && sizeof(DISKINFO) == 288);
+static_assert(offsetof(TAVODISKINFO, szName) == 4 && offsetof(TAVODISKINFO, nKind) == 68);
+static_assert(offsetof(TAVODISKINFO, cMibDisk) == 72 && offsetof(TAVODISKINFO, nStatus) == 80);
+static_assert(offsetof(TavoPartitionEntry, cBlock) == 24 && offsetof(TavoPartitionEntry, szDisk) == 32 &&
+              offsetof(TavoPartitionEntry, szPath) == 288 && sizeof(TavoPartitionEntry) == 416);
+static_assert(offsetof(TavoPartitionLayout, rgEntry) == 136 && sizeof(TavoPartitionLayout) == 136 + 513 * 416);
+static_assert(sizeof(void *) != 4 || BLKGETSIZE64 == 0x80041272);
+
+constexpr uint64_t kDiskBytes = uint64_t{6} * 1000 * 1000 * 1000 * 1000 + 100;
+
+// Answers the size, and SMART data with one attribute.
+test::RecordedCalls::Request Drive(uint64_t bytes = kDiskBytes, int attribute = 194)
+{
+    return [=](int, unsigned long request, void *argument) {
+        unsigned char *const data = static_cast<unsigned char *>(argument);
+        if (request == BLKGETSIZE64) {
+            std::memcpy(argument, &bytes, sizeof bytes);
+            return 0;
+        }
+        if (request == HDIO_DRIVE_CMD && data && data[0] == 0xB0 && data[2] == 0xD0) {
+            data[4 + 2] = static_cast<unsigned char>(attribute);
+            data[4 + 2 + 5] = 38;
+            return 0;
+        }
+        errno = ENOTTY;
+        return -1;
+    };
+}
+
+void AddDrive(test::DeviceTree &tree, const std::string &name, unsigned minor, const std::string &model)
+{
+    tree.AddDisk("/dev/" + name, 8, minor);
+    tree.Put("/sys/block/" + name + "/device/model", model + "\n");
+}
+
+TEST(DiskPathParse, Table)
+{
+    const struct {
+        const char *text;
+        DISKPATH path;
+    } good[] = {
+        {"sda", {1, 1, 0, 0}},          {"/dev/sda", {1, 1, 0, 0}},    {"/dev/sda3\n", {1, 1, 0, 3}},
+        {"/dev/sdab12", {2, 2, 1, 12}}, {"/dev/sdz\n", {26, 1, 0, 0}}, {"sdba", {1, 2, 2, 0}},
+        {"sda1;reboot", {1, 1, 0, 1}},
+    };
+    const test::CapturedLog log;
+    for (const auto &row : good) {
+        DISKPATH path = {};
+        EXPECT_EQ(DiskPathParse(row.text, &path), 0) << row.text;
+        EXPECT_EQ(std::memcmp(&path, &row.path, sizeof path), 0) << row.text;
+    }
+    EXPECT_THAT(log.Lines(), IsEmpty());
+
+    for (const char *bad : {"", "sd", "/dev/sd", "hda", "/dev/hda", "/dev//sda", "//dev/sda", "sda-1", "sda x", "sdabc",
+                            "sd1", "sdA", "sda99999999999"}) {
+        DISKPATH path = {7, 7, 7, 7};
+        EXPECT_EQ(DiskPathParse(bad, &path), -1) << bad;
+        EXPECT_EQ(path.iDisk, 7) << bad;
+    }
+    EXPECT_THAT(log.Texts(),
+                testing::Contains(testing::MatchesRegex("disk_path_parse:[0-9]+ bad paramters: disk path: hda")));
+    EXPECT_THAT(log.Texts(), testing::Contains(testing::MatchesRegex(
+                                 "disk_path_parse:[0-9]+ bad paramters: disk path: sda-1, ptr = -")));
+    DISKPATH path;
+    EXPECT_EQ(DiskPathParse(nullptr, &path), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "disk_path_parse"}));
+}
+
+TEST(DiskInfoGet, DescribesTheWholeDisk)
+{
+    test::DeviceTree tree;
+    AddDrive(tree, "sda", 0, "NASLAB-HD-0     ");
+    const test::RecordedCalls calls(Drive());
+    const test::CapturedLog log;
+    DISKINFO *info = nullptr;
+    ASSERT_EQ(DiskInfoGet("/dev/sda3", &info), 1);
+    EXPECT_EQ(info->iDisk, 1);
+    EXPECT_EQ(info->nNameKind, DISK_NAME_PORT);
+    EXPECT_EQ(info->iUnit, 0);
+    EXPECT_EQ(info->nPartition, 3);
+    EXPECT_STREQ(info->szPath, "/dev/sda");
+    EXPECT_STREQ(info->szModel, "NASLAB-HD-0     ");
+    EXPECT_EQ(info->cbDisk, kDiskBytes - 100 % 512);
+    EXPECT_EQ(info->nTemperature, 38);
+    DiskInfoFree(info);
+    EXPECT_THAT(log.Lines(), IsEmpty());
+}
+
+TEST(DiskInfoGet, EmptyBaysAndFailures)
+{
+    test::DeviceTree tree;
+    tree.AddAbsent("/dev/sdb");
+    AddDrive(tree, "sdc", 32, "x");
+    test::RecordedCalls calls;
+    const test::CapturedLog log;
+    DISKINFO *info = nullptr;
+    test::ForgetFault();
+    EXPECT_EQ(DiskInfoGet("/dev/sdb", &info), 0);
+    EXPECT_THAT(log.Lines(), IsEmpty()) << "an empty bay is nothing to report";
+    EXPECT_EQ(LastFault(), Fault{});
+    EXPECT_EQ(DiskInfoGet("/dev/sdq", &info), -1);
+    EXPECT_EQ(DiskInfoGet("/dev/sdc", &info), -1);
+    EXPECT_EQ(DiskInfoGet("rubbish", &info), -1);
+    EXPECT_EQ(info, nullptr);
+    EXPECT_THAT(
+        log.Texts(),
+        testing::IsSupersetOf({testing::MatchesRegex("disk_info_get:[0-9]+ Failed to open /dev/sdq, errno=No such.*"),
+                               testing::MatchesRegex("disk_info_get:[0-9]+ Failed to ioctl /dev/sdc, errno=.*")}));
+
+    uint64_t sectors = 5;
+    EXPECT_EQ(DiskSizeGet("/dev/sdb", &sectors), 0);
+    EXPECT_EQ(DiskSizeGet("/dev/sdq", &sectors), -1);
+    EXPECT_EQ(sectors, 5u);
+    calls.OnIoctl(Drive(1535));
+    EXPECT_EQ(DiskSizeGet("/dev/sdc", &sectors), 1);
+    EXPECT_EQ(sectors, 2u);
+    EXPECT_EQ(DiskIsExist("/dev/sdc"), 1);
+    EXPECT_EQ(DiskIsExist("/dev/sdb"), 0);
+    EXPECT_EQ(DiskIsExist(nullptr), -1);
+}
+
+TEST(DiskInfoEnum, BaysInOrderThenUnits)
+{
+    test::DeviceTree tree;
+    tree.Put("/etc.defaults/tavoinfo.conf", "maxdisks=\"4\"\nsupportebox=\"yes\"\n");
+    AddDrive(tree, "sdc", 32, "third");
+    AddDrive(tree, "sda", 0, "first");
+    tree.AddAbsent("/dev/sdb");
+    tree.Put("/sys/class/ata_device/dev4.0/class", "pmp\n");
+    tree.Put("/sys/class/ata_link/link4/sata_spd", "3.0 Gbps\n");
+    AddDrive(tree, "sdd", 48, "hidden by the unit");
+    AddDrive(tree, "sdaa", 64, "unit, first");
+    AddDrive(tree, "sdac", 80, "unit, third");
+    AddDrive(tree, "sde", 96, "beyond the bays");
+    const test::RecordedCalls calls(Drive());
+    const test::CapturedLog log;
+    const auto enumerate = [](const int *filter) {
+        std::vector<std::string> found;
+        DISKLIST *list = nullptr;
+        EXPECT_GE(DiskInfoEnum(filter, &list), 0);
+        for (const DISKLIST *node = list; node; node = node->pNext)
+            found.push_back(std::string(node->pInfo->szPath) + " " + node->pInfo->szModel);
+        DiskInfoEnumFree(list);
+        return found;
+    };
+    test::ForgetFault();
+    EXPECT_THAT(enumerate(nullptr),
+                ElementsAre("/dev/sda first", "/dev/sdc third", "/dev/sdaa unit, first", "/dev/sdac unit, third"));
+    const int internal = DISK_ENUM_INTERNAL;
+    const int units = DISK_ENUM_UNITS;
+    const int none = 0;
+    EXPECT_THAT(enumerate(&internal), ElementsAre("/dev/sda first", "/dev/sdc third"));
+    EXPECT_EQ(enumerate(&units).size(), 2u);
+    EXPECT_EQ(enumerate(&none).size(), 4u);
+    EXPECT_THAT(log.Lines(), IsEmpty()) << "neither a missing node nor an empty bay is worth a line";
+    EXPECT_EQ(LastFault(), Fault{});
+
+    tree.Put("/sys/class/ata_link/link4/sata_spd", "<unknown>\n");
+    EXPECT_THAT(enumerate(&units), IsEmpty()) << "switched off";
+    tree.Remove("/sys/class");
+    DISKLIST *list = nullptr;
+    EXPECT_EQ(DiskInfoEnum(nullptr, &list), -1);
+    EXPECT_EQ(list, nullptr);
+    EXPECT_THAT(log.Texts(),
+                ElementsAre(testing::MatchesRegex("disk_info_enum:[0-9]+ Failed to enum ebox, errno=0x900")));
+}
+
+TEST(Model, BaysAndLimits)
+{
+    const struct {
+        const char *settings;
+        int bays;
+        unsigned long limit;
+    } rows[] = {
+        {"", 4, 0},
+        {"maxdisks=\"6\"\nraidsizelimit=\"2147483648\"\n", 6, 2147483648},
+        {"maxdisks=26\nraidsizelimit=\n", 10, 0},
+        {"maxdisks=0\nraidsizelimit=-1\n", 4, 0},
+        {"maxdisks=6x\n", 4, 0},
+    };
+    for (const auto &row : rows) {
+        test::DeviceTree tree;
+        tree.Put("/etc.defaults/tavoinfo.conf", row.settings);
+        EXPECT_EQ(TAVOMaxDiskGet(), row.bays) << row.settings;
+        EXPECT_EQ(RAIDSizeLimitGet(), row.limit) << row.settings;
+        EXPECT_EQ(TAVOEBoxDevIs(0), 0);
+    }
+}
+
+TEST(TAVODiskEnum, IdeFirstWholeDisksOnly)
+{
+    test::DeviceTree tree;
+    const test::RecordedCalls calls(Drive(uint64_t{98304} << 10));
+    tree.Put("/proc/partitions", std::string(test::Capture("proc_partitions-linux-6.1-armmp-lpae")) +
+                                     "   3       64      100 hdb\n   3       65      100 hdb1\n  65       16  1 sdr\n"
+                                     " 259        0      100 sdzz\n   8      256      100 sdzy\n");
+    int32_t *numbers = nullptr;
+    ASSERT_EQ(TAVODiskEnum(1, &numbers), 8);
+    EXPECT_THAT(std::vector<int32_t>(numbers, numbers + 8),
+                ElementsAre(832, 2048, 2064, 2080, 2096, 2112, 2128, 16656));
+    std::free(numbers);
+
+    tree.AddDisk("/dev/sdb", 8, 16);
+    TAVODISKINFO *info = nullptr;
+    ASSERT_EQ(TAVODiskGetInfo(1, 2064, &info), 0);
+    EXPECT_EQ(info->nDevice, 2064);
+    EXPECT_STREQ(info->szName, "sdb");
+    EXPECT_EQ(info->nKind, 7);
+    EXPECT_EQ(info->cMibDisk, 96u);
+    EXPECT_EQ(info->nStatus, 0);
+    std::free(info);
+
+    const struct {
+        int kind;
+        int number;
+        int code;
+    } refusals[] = {
+        {2, 2064, ERR_BAD_PARAMETERS},
+        {1, 2065, ERR_NO_DISK_ID},  // a partition
+        {1, 9999, ERR_NO_DISK_ID},
+        {1, 2080, ERR_DISK_IO_FAILED},  // no node
+    };
+    for (const auto &row : refusals) {
+        info = nullptr;
+        EXPECT_EQ(TAVODiskGetInfo(row.kind, row.number, &info), -1);
+        EXPECT_EQ(LastFault(), (Fault{row.code, "disk_get_info"})) << row.number;
+        EXPECT_EQ(info, nullptr);
+    }
+    tree.Put("/proc/partitions", "major minor  #blocks  name\n\n");
+    EXPECT_EQ(TAVODiskEnum(1, &numbers), 0);
+    EXPECT_EQ(numbers, nullptr);
+    tree.Remove("/proc/partitions");
+    EXPECT_EQ(TAVODiskEnum(1, &numbers), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "disk_enum"}));
+}
+
+TEST(DiskContainerGet, Table)
+{
+    test::DeviceTree tree;
+    tree.Put("/etc.defaults/tavoinfo.conf", "esatadiskname=\"sdy\"\n");
+    const struct {
+        const char *path;
+        int kind;  // 0: refused
+    } rows[] = {
+        {"/dev/sda", 1},   {"sdj", 1}, {"sdj3\n", 1},   {"sdk", 4},      {"/dev/sdk1", 4}, {"sdab", 2},
+        {"/dev/sdab5", 2}, {"sdy", 8}, {"/dev/sdy", 8}, {"sdy1", 4},     {"sd", 0},        {"", 0},
+        {"hda", 0},        {"sd1", 0}, {"sda-", 0},     {"/dev/md0", 0},
+    };
+    for (const auto &row : rows) {
+        const test::CapturedLog log;
+        int kind = 0;
+        EXPECT_EQ(DiskContainerGet(row.path, &kind), row.kind ? 0 : -1) << row.path;
+        EXPECT_EQ(kind, row.kind) << row.path;
+        EXPECT_EQ(std::any_of(log.Lines().begin(), log.Lines().end(),
+                              [](const auto &line) { return line.priority == LOG_ERR; }),
+                  row.kind == 0)
+            << row.path;
+    }
+}
+
+TEST(TAVODiskPartitionNumGet, Table)
+{
+    const struct {
+        const char *path;
+        int size;
+        int number;
+        const char *base;
+    } rows[] = {
+        {"sda3", 16, 3, "sda"},     {"sda10", 16, 10, "sda"}, {"sda", 16, 0, "sda"}, {"sda03", 16, 3, "sda0"},
+        {"sda100", 16, 100, "sda"}, {"sdabcd5", 4, 0, "sda"}, {"3", 16, -1, "?"},    {"", 16, -1, "?"},
+        {"sda3", 2, 0, "s"},        {"sda3", 1, -1, "?"},
+    };
+    for (const auto &row : rows) {
+        char base[16] = "?";
+        EXPECT_EQ(TAVODiskPartitionNumGet(row.path, base, row.size), row.number) << row.path;
+        EXPECT_STREQ(base, row.base) << row.path;
+    }
+}
+
+TEST(Model, OfADrive)
+{
+    test::DeviceTree tree;
+    AddDrive(tree, "sda", 0, "NASLAB-HD-0     ");
+    tree.AddDisk("/dev/sdb", 8, 16);
+    const test::CapturedLog log;
+    char model[128];
+    EXPECT_EQ(TAVOLnxDiskGetModel("/dev/sda", model, sizeof model), 0);
+    EXPECT_STREQ(model, "NASLAB-HD-0     ");
+    char small[7];
+    EXPECT_EQ(TAVOLnxDiskGetModel("/dev/sda", small, sizeof small), 0);
+    EXPECT_STREQ(small, "NASLAB");
+    EXPECT_THAT(log.Lines(), IsEmpty());
+    EXPECT_EQ(TAVOLnxDiskGetModel("/dev/sdb", model, sizeof model), -1);
+    EXPECT_EQ(TAVOLnxDiskGetModel("/dev/sdz", model, sizeof model), -1);
+    EXPECT_THAT(
+        log.Texts(),
+        ElementsAre(
+            testing::MatchesRegex("lnx_disk_get_model \\([0-9]+\\) Failed to open /sys/block/sdb/device/model"),
+            testing::MatchesRegex("lnx_disk_get_model\\([0-9]+\\) Failed to open /dev/sdz. 2 \\(No such file.*")));
+}
+
+TEST(TAVODiskIsMvSocDriver, FollowsTheLink)
+{
+    const struct {
+        const char *link;
+        const char *id;  // of the controller; NULL for no such file
+        int result;
+    } rows[] = {
+        {"../../../0:0:0:0", nullptr, 0},
+        {"../../devices/platform/host3/target3:0:0/3:0:0:0", nullptr, 1},
+        {"../../devices/pci0000:00/0000:00:01.0/host0/target0:0:0/0:0:0:0", "0x7042\n", 1},
+        {"../../devices/pci0000:00/0000:00:01.0/host0/target0:0:0/0:0:0:0", "0x6145\n", 1},
+        {"../../devices/pci0000:00/0000:00:01.0/host0/target0:0:0/0:0:0:0", "0x7042", 0},
+        {"../../devices/pci0000:00/0000:00:01.0/host0/target0:0:0/0:0:0:0", "0x8086\n", 0},
+        {"../../devices/pci0000:00/0000:00:01.0/host0/target0:0:0/0:0:0:0", nullptr, -1},
+        {nullptr, nullptr, -1},
+    };
+    for (const auto &row : rows) {
+        test::DeviceTree tree;
+        const test::CapturedLog log;
+        tree.Put("/sys/block/sda/size", "1\n");
+        if (row.link)
+            tree.Link("/sys/block/sda/device", row.link);
+        if (row.id)
+            tree.Put("/sys/devices/pci0000:00/0000:00:01.0/device", row.id);
+        EXPECT_EQ(TAVODiskIsMvSocDriver("/dev/sda"), row.result) << (row.link ? row.link : "");
+        EXPECT_EQ(log.Lines().size(), row.result < 0 ? 1u : 0u);
+    }
+}
+
+TEST(DiskDDStatusGet, Table)
+{
+    const struct {
+        const char *line;  // NULL: no job
+        int result;
+        uint64_t done, total;
+    } rows[] = {
+        {nullptr, 0, 7, 7},
+        {"3145728/10485760\n", 0, 3, 10},
+        {"0/6000000000000\n", 0, 0, 5722045},
+        {"3145728\n", -1, 7, 7},
+        {"a/b\n", -1, 7, 7},
+        {"-1/5\n", -1, 7, 7},
+        {"1/99999999999999999999\n", -1, 7, 7},
+        {"", -1, 7, 7},
+    };
+    for (const auto &row : rows) {
+        ::unlink("/tmp/tavodd.sdq");
+        if (row.line)
+            test::WriteFile("/tmp/tavodd.sdq", row.line);
+        uint64_t done = 7;
+        uint64_t total = 7;
+        EXPECT_EQ(DiskDDStatusGet("/dev/sdq", &done, &total), row.result);
+        EXPECT_EQ(done, row.done);
+        EXPECT_EQ(total, row.total);
+    }
+    ::unlink("/tmp/tavodd.sdq");
+}
+
+TEST(TAVODiskGetDevnameFromFd, AsksTheKernel)
+{
+    test::DeviceTree tree;
+    tree.AddDisk("/dev/sda", 8, 3);
+    tree.AddDisk("/dev/sdb", 104, 0);
+    tree.Link("/sys/dev/block/8:3", "../../devices/pci0000:00/ata1/host0/block/sda/sda3");
+    tree.Link("/sys/dev/block/104:0", "../../devices/pci0000:00/block/cciss!c0d0");
+    const auto name_of = [](const char *path) {
+        const int fd = ::open(path, O_RDONLY | O_CLOEXEC);
+        char *const name = TAVODiskGetDevnameFromFd(fd);
+        ::close(fd);
+        const std::string copy = name ? name : "(none)";
+        std::free(name);
+        return copy;
+    };
+    EXPECT_EQ(name_of("/dev/sda"), "/dev/sda3");
+    EXPECT_EQ(name_of("/dev/sdb"), "/dev/cciss/c0d0");
+    EXPECT_EQ(name_of("/dev/null"), "(none)");
+    EXPECT_EQ(LastFault(), (Fault{ERR_NOT_A_DISK, "disk_get_devname_from_fd"}));
+    EXPECT_EQ(TAVODiskGetDevnameFromFd(-1), nullptr);
+    EXPECT_EQ(LastFault(), (Fault{ERR_STAT_FAILED, "disk_get_devname_from_fd"}));
+}
+
+class Layout : public testing::Test {
+  protected:
+    Layout() { std::memset(layout_.get(), 0x5A, sizeof *layout_); }
+
+    test::DeviceTree tree_;
+    test::RecordedCommands commands_;
+    test::CapturedLog log_;
+    std::unique_ptr<TavoPartitionLayout> layout_ = std::make_unique<TavoPartitionLayout>();
+};
+
+TEST_F(Layout, TakesTheRowsOfItsDiskAlone)
+{
+    tree_.Put("/proc/partitions",
+              "major minor  #blocks  name\n\n   8  0  98304 sda\n   8  3  76800 sda3\n 259 7 5 sda512\n"
+              "   8  9  1 sda513\n   8 9 1 sda0\n   8 9 1 sda03\n  65 9 1 sdaa\n  65 9 1 sdab1\n   8 9 1 xsda2\n");
+    ASSERT_EQ(DiskPartitionsLayoutGet("sda", layout_.get()), 0);
+    EXPECT_EQ(layout_->nEntry, 3);
+    EXPECT_EQ(layout_->nKind, DISK_LAYOUT_PLAIN);
+    EXPECT_STREQ(layout_->szDisk, "sda");
+    EXPECT_EQ(layout_->rgEntry[0].nKind, DISK_ENTRY_DISK);
+    EXPECT_EQ(layout_->rgEntry[0].cBlock, 98304);
+    EXPECT_STREQ(layout_->rgEntry[0].szPath, "/dev/sda");
+    EXPECT_EQ(layout_->rgEntry[3].nKind, DISK_ENTRY_PARTITION);
+    EXPECT_STREQ(layout_->rgEntry[3].szDisk, "sda");
+    EXPECT_STREQ(layout_->rgEntry[3].szName, "sda3");
+    EXPECT_STREQ(layout_->rgEntry[3].szPath, "/dev/sda3");
+    EXPECT_EQ(layout_->rgEntry[512].nMajor, 259);
+    EXPECT_EQ(layout_->rgEntry[512].nMinor, 7);
+    EXPECT_EQ(layout_->rgEntry[511].iEntry, 511);
+    int used = 0;
+    for (const TavoPartitionEntry &entry : layout_->rgEntry)
+        used += entry.nKind != DISK_ENTRY_UNUSED;
+    EXPECT_EQ(used, 3);
+
+    tree_.Put("/proc/partitions", "   8  0  98304 sdb\n");
+    ASSERT_EQ(DiskPartitionsLayoutGet("sda", layout_.get()), 0);
+    EXPECT_EQ(layout_->nEntry, 0);
+    EXPECT_EQ(layout_->nKind, DISK_LAYOUT_UNSET);
+    tree_.Remove("/proc/partitions");
+    EXPECT_EQ(DiskPartitionsLayoutGet("sda", layout_.get()), -1);
+    EXPECT_THAT(log_.Texts(),
+                testing::Contains(testing::MatchesRegex(
+                    "disk_partitions_layout_get:[0-9]+ Failed to read line of /proc/partitions, errno=0x900")));
+    EXPECT_EQ(DiskPartitionsLayoutGet("s", layout_.get()), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "disk_partitions_layout_get"}));
+}
+
+TEST_F(Layout, KnowsSystemDisksAndSpecialDevices)
+{
+    tree_.Put("/proc/partitions", "   8  16  98304 sdb\n   8  17  1 sdb1\n");
+    tree_.Put("/etc.defaults/tavoinfo.conf", "supportraid=\"yes\"\n");
+    commands_.OnCommand([](const std::string &command) -> test::CommandReply {
+        if (command == "/sbin/sfdisk -l -uS -N1 /dev/sdb")
+            return {0, "/dev/sdb1 256 4980735 4980480 fd Linux raid autodetect\n"};
+        return {0, "/dev/sdb2 4980736 9175039 4194304 fd Linux raid autodetect\n"};
+    });
+    ASSERT_EQ(DiskPartitionsLayoutGet("sdb", layout_.get()), 0);
+    EXPECT_EQ(layout_->nKind, DISK_LAYOUT_SYSTEM);
+    EXPECT_EQ(layout_->rgEntry[3].nKind, DISK_ENTRY_DATA);
+    EXPECT_THAT(commands_.Commands(),
+                ElementsAre("/sbin/sfdisk -l -uS -N1 /dev/sdb", "/sbin/sfdisk -l -uS -N2 /dev/sdb"));
+
+    commands_.OnCommand([](const std::string &) -> test::CommandReply { return {1, ""}; });
+    const std::string usb = "/sys/devices/pci0000:00/usb1/1-1/";
+    tree_.Put(usb + "1-1:1.0/host6/target6:0:0/6:0:0:0/model", "x\n");
+    tree_.Put(usb + "idVendor", "05ac\n");
+    tree_.Put(usb + "idProduct", "1209\n");
+    tree_.Link("/sys/block/sdb/device", "../../devices/pci0000:00/usb1/1-1/1-1:1.0/host6/target6:0:0/6:0:0:0");
+    ASSERT_EQ(DiskPartitionsLayoutGet("sdb", layout_.get()), 0);
+    EXPECT_EQ(layout_->nKind, DISK_LAYOUT_SPECIAL);
+    EXPECT_EQ(layout_->rgEntry[2].nKind, DISK_ENTRY_SPECIAL);
+}
+
+// Whatever the kernel's file says, nothing outside the caller's block is written.
+TEST_F(Layout, StaysWithinItsBlock)
+{
+    struct Fenced {
+        unsigned char before[4096];
+        TavoPartitionLayout layout;
+        unsigned char after[4096];
+    };
+    const auto fenced = std::make_unique<Fenced>();
+    std::mt19937 random(20240611);
+    const auto pick = [&](std::initializer_list<const char *> words) {
+        return std::string(words.begin()[random() % words.size()]);
+    };
+    for (int round = 0; round < 2000; ++round) {
+        std::string text;
+        for (int line = 0; line < 6; ++line) {
+            text += pick({"8", "-8", "4294967295", "x", "", "259"}) + " " +
+                    pick({"0", "513", "18446744073709551616", "y"}) + " " +
+                    pick({"1", "-1", "9223372036854775808", "18446744073709551615"}) + " " +
+                    pick({"sda", "sdaa", "sd", "sda.", ""}) +
+                    pick({"", "1", "512", "513", "-1", "4294967297", "99999999999999999999", "0", "1x"}) +
+                    (random() % 50 ? "" : std::string(5000, 'z')) + pick({"\n", "\n", "", " extra\n"});
+        }
+        tree_.Put("/proc/partitions", text);
+        std::memset(fenced.get(), 0xA5, sizeof *fenced);
+        ASSERT_EQ(DiskPartitionsLayoutGet("sda", &fenced->layout), 0);
+        const auto is_fence = [](unsigned char byte) {
+            return byte == 0xA5;
+        };
+        ASSERT_TRUE(std::all_of(std::begin(fenced->before), std::end(fenced->before), is_fence)) << text;
+        ASSERT_TRUE(std::all_of(std::begin(fenced->after), std::end(fenced->after), is_fence)) << text;
+    }
+}
+
+TEST(HostileNames, OpenNothingElseAndRunNothing)
+{
+    test::DeviceTree tree;
+    tree.Put("/proc/partitions", "   8  0  98304 sda\n");
+    const test::RecordedCalls calls;
+    const test::RecordedCommands commands;
+    const test::CapturedLog log;
+    const auto layout = std::make_unique<TavoPartitionLayout>();
+    for (const std::string &name : test::HostileNames()) {
+        char text[64] = "";
+        uint64_t number = 7;
+        DISKINFO *info = nullptr;
+        EXPECT_NE(TAVODiskUSBGetInfo(name.c_str(), &number), 0) << name;
+        EXPECT_NE(TAVOLnxDiskGetModel(name.c_str(), text, sizeof text), 0) << name;
+        EXPECT_NE(TAVODiskIsMvSocDriver(name.c_str()), 1) << name;
+        EXPECT_NE(DiskInfoGet(name.c_str(), &info), 1) << name;
+        DiskPartitionsLayoutGet(name.c_str(), layout.get());
+        EXPECT_EQ(layout->nEntry, 0) << name;
+        DiskDDStatusGet(name.c_str(), &number, &number);
+        EXPECT_EQ(number, 7u) << name;
+    }
+    EXPECT_THAT(commands.Commands(), IsEmpty());
+    for (const std::string &path : tree.Opened())
+        EXPECT_EQ(path.find(".."), path.npos) << path;
+}
+
+}  // namespace

@@ -1,0 +1,52 @@
+// Takes the place of the kernel's view of the disks: while one of these stands, this process finds /dev/sd*, /dev/md*,
+// /sys, /proc/partitions and the model's settings in a directory of the test's own. Programs that it starts do not.
+#ifndef TESTS_SUPPORT_DEVICE_TREE_H
+#define TESTS_SUPPORT_DEVICE_TREE_H
+
+#include "support/scratch_dir.h"
+
+#include <map>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include <sys/types.h>
+
+namespace test {
+
+class DeviceTree {
+  public:
+    DeviceTree();
+    ~DeviceTree();
+    DeviceTree(const DeviceTree &) = delete;
+    DeviceTree &operator=(const DeviceTree &) = delete;
+
+    // Any of the redirected files, with the directories above it.
+    void Put(const std::string &path, std::string_view text);
+    void Link(const std::string &path, const std::string &target);
+    void Remove(const std::string &path);
+
+    // A device node: fstat tells a block device of that number.
+    void AddDisk(const std::string &path, unsigned major, unsigned minor, std::string_view content = "");
+    // A node whose device is not there: opening it gives ENXIO.
+    void AddAbsent(const std::string &path);
+
+    // Every path that was opened, in order, as the library named it.
+    const std::vector<std::string> &Opened() const { return opened_; }
+
+    // For the interposed functions.
+    bool Redirects(std::string_view path) const;
+    std::string Place(std::string_view path) const { return dir_ / std::string(path); }
+    void NoteOpen(std::string_view path) { opened_.emplace_back(path); }
+    bool IsDisk(ino_t inode, dev_t &number) const;
+    static DeviceTree *Current();
+
+  private:
+    ScratchDir dir_;
+    std::map<ino_t, dev_t> disks_;
+    std::vector<std::string> opened_;
+};
+
+}  // namespace test
+
+#endif

@@ -1,0 +1,271 @@
+// The appliance's partitioning tool, run on image files.
+#include "support/scratch_dir.h"
+
+#include <gmock/gmock.h>
+
+#include <cstdint>
+#include <cstdlib>
+#include <cstring>
+#include <string>
+#include <vector>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace {
+
+constexpr off_t kGiB = off_t{1} << 30;
+
+struct Result {
+    int status;
+    std::string output;
+    std::string error;
+};
+
+class Sfdisk : public testing::Test {
+  protected:
+    void SetUp() override
+    {
+        if (!std::getenv("TAVO_ROOT_FORM") || std::strstr(std::getenv("TAVO_ROOT_LACKS"), "foreign-exec"))
+            GTEST_SKIP() << "runs /sbin/sfdisk: only in an appliance root that runs it";
+        Resize(8 * kGiB);
+    }
+
+    void Resize(off_t bytes)
+    {
+        const int fd = ::open(image_.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0600);
+        ASSERT_EQ(::ftruncate(fd, bytes), 0);
+        ::close(fd);
+    }
+
+    // Runs it on the image.
+    Result Run(std::vector<std::string> words)
+    {
+        words.insert(words.begin(), "/sbin/sfdisk");
+        words.push_back(image_);
+        const std::string output = dir_ / "output";
+        const std::string error = dir_ / "error";
+        const pid_t child = ::fork();
+        if (child == 0) {
+            ::dup2(::open(output.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600), 1);
+            ::dup2(::open(error.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600), 2);
+            std::vector<char *> argv;
+            for (std::string &word : words)
+                argv.push_back(word.data());
+            argv.push_back(nullptr);
+            ::execv(argv[0], argv.data());
+            ::_exit(127);
+        }
+        int status = 0;
+        ::waitpid(child, &status, 0);
+        return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, test::ReadFile(output), test::ReadFile(error)};
+    }
+
+    std::string Sector(off_t number = 0)
+    {
+        std::string sector(512, '?');
+        const int fd = ::open(image_.c_str(), O_RDONLY | O_CLOEXEC);
+        EXPECT_EQ(::pread(fd, sector.data(), sector.size(), number * 512), 512);
+        ::close(fd);
+        return sector;
+    }
+
+    void PutSector(off_t number, const std::string &sector)
+    {
+        const int fd = ::open(image_.c_str(), O_WRONLY | O_CLOEXEC);
+        EXPECT_EQ(::pwrite(fd, sector.data(), sector.size(), number * 512), 512);
+        ::close(fd);
+    }
+
+    // The list without the name of the image.
+    std::string List(std::vector<std::string> words = {"-l", "-uS"})
+    {
+        std::string text = Run(words).output;
+        for (size_t at; (at = text.find(image_)) != text.npos;)
+            text.erase(at, image_.size());
+        return text;
+    }
+
+    test::ScratchDir dir_;
+    std::string image_ = dir_ / "disk";
+};
+
+std::string Entry(std::initializer_list<unsigned char> bytes)
+{
+    return {bytes.begin(), bytes.end()};
+}
+
+// A table sector with these entries.
+std::string Table(const std::vector<std::string> &entries)
+{
+    std::string sector(512, '\0');
+    for (size_t i = 0; i < entries.size(); ++i)
+        sector.replace(446 + 16 * i, entries[i].size(), entries[i]);
+    return sector.replace(510, 2, "\x55\xAA");
+}
+
+std::string SmallEntry(unsigned char type, unsigned char start, unsigned char count)
+{
+    return Entry({0, 0, 0, 0, type, 0, 0, 0, start, 0, 0, 0, count, 0, 0, 0});
+}
+
+TEST_F(Sfdisk, MakesAndUnmakesTheLayoutOfASystemDisk)
+{
+    PutSector(0, std::string(512, 'x'));
+    EXPECT_EQ(Run({"-M1"}).status, 0);
+    EXPECT_EQ(Sector(), Table({})) << "nothing of what stood there is left";
+    EXPECT_EQ(Run({"-N1", "-uS", "-q", "-f", "-j256", "-z4980480", "-tfd", "-F"}).status, 0);
+    EXPECT_EQ(Run({"-N2", "-uS", "-q", "-f", "-j0", "-z4194304", "-tfd", "-F"}).status, 0);
+    EXPECT_EQ(Run({"-N3", "-uS", "-q", "-f", "-j262144", "-z-1", "-tfd", "-F"}).status, 0);
+    EXPECT_EQ(List(), "1 256 4980735 4980480 fd Linux raid autodetect\n"
+                      "2 4980736 9175039 4194304 fd Linux raid autodetect\n"
+                      "3 9437184 16777215 7340032 fd Linux raid autodetect\n");
+    EXPECT_EQ(List({"-l", "-uS", "-N2"}), "2 4980736 9175039 4194304 fd Linux raid autodetect\n");
+    // Cylinder, head and sector as every other tool writes them: 0/4/5 for sector 256, 310/9/19 for 4980735.
+    EXPECT_EQ(Sector().substr(446, 16), Entry({0, 4, 5, 0, 0xFD, 9, 0x53, 0x36, 0, 1, 0, 0, 0, 0xFF, 0x4B, 0}));
+
+    EXPECT_EQ(Run({"-N3", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0);
+    EXPECT_EQ(Run({"-N3", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0) << "empty already";
+    EXPECT_EQ(Run({"-N5", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 1) << "no such thing";
+    const Result absent = Run({"-l", "-uS", "-N3"});
+    EXPECT_EQ(absent.status, 1);
+    EXPECT_EQ(absent.output + absent.error, "");
+    EXPECT_EQ(Sector().substr(478, 32), std::string(32, '\0'));
+    struct stat facts;
+    ASSERT_EQ(::stat(image_.c_str(), &facts), 0);
+    EXPECT_LE(facts.st_blocks, 16) << "nothing but the first sector was written";
+}
+
+TEST_F(Sfdisk, ChangesNothingButTheEntry)
+{
+    std::string before = Table({SmallEntry(0x83, 8, 8), SmallEntry(0x82, 16, 8)});
+    before.replace(0, 446, std::string(446, 'b'));
+    before[446] = '\x80';
+    PutSector(0, before);
+    EXPECT_EQ(Run({"-N2", "-j4", "-z2", "-tee", "-q"}).status, 0);
+    std::string after = Sector();
+    EXPECT_EQ(after.substr(478 - 16 + 8, 8), Entry({20, 0, 0, 0, 2, 0, 0, 0}));
+    after.replace(462, 16, before, 462, 16);
+    EXPECT_EQ(after, before);
+}
+
+TEST_F(Sfdisk, RefusesWhatDoesNotFit)
+{
+    const struct {
+        off_t bytes;
+        std::vector<std::string> words;
+        const char *complaint;
+    } rows[] = {
+        {kGiB, {"-N1", "-j0", "-z10", "-t83"}, "cover the partition table"},
+        {kGiB, {"-N1", "-j2097152", "-z-1", "-t83"}, "start beyond"},
+        {kGiB, {"-N1", "-j1", "-z2097152", "-t83"}, "reach beyond"},
+        {kGiB, {"-N1", "-j1", "-z18446744073709551615", "-t83"}, "reach beyond"},
+        {kGiB, {"-N1", "-j18446744073709551615", "-z1", "-t83"}, "start beyond"},
+        {kGiB, {"-N4", "-o107", "-z10", "-t83"}, "overlap partition 3"},
+        {kGiB, {"-N4", "-o95", "-z10", "-t83"}, "overlap partition 3"},
+        {kGiB, {"-N4", "-o90", "-z100", "-t83"}, "overlap partition 3"},
+        {4096 * kGiB, {"-N1", "-o4294967296", "-z1", "-t83"}, "sector 2^32"},
+        {4096 * kGiB, {"-N1", "-o4294967295", "-z2", "-t83"}, "sector 2^32"},
+        {kGiB, {"-N5", "-j1", "-z1", "-t83"}, "only partitions 1 to 4"},
+        {kGiB, {"-N1", "-j1", "-z1", "-tf"}, "extended partitions"},
+    };
+    const std::string table = Table({"", "", SmallEntry(0x83, 100, 8)});
+    for (const auto &row : rows) {
+        Resize(row.bytes);
+        PutSector(0, table);
+        const Result result = Run(row.words);
+        EXPECT_EQ(result.status, 1) << row.complaint;
+        EXPECT_THAT(result.error, testing::HasSubstr(row.complaint));
+        EXPECT_EQ(Sector(), table);
+    }
+    EXPECT_EQ(Run({"-N4", "-o108", "-z10", "-t83"}).status, 0) << "right behind it";
+
+    PutSector(0, Table({SmallEntry(0xEE, 1, 255)}));
+    EXPECT_THAT(Run({"-N2", "-j1", "-z1", "-t83"}).error, testing::HasSubstr("GUID"));
+    PutSector(0, std::string(512, '\0'));
+    EXPECT_THAT(Run({"-N1", "-j1", "-z1", "-t83"}).error, testing::HasSubstr("no partition table"));
+    EXPECT_EQ(Run({"-l"}).status, 1);
+    EXPECT_EQ(Run({"-l", "-N1"}).error, "") << "that a blank disk lacks a partition is an answer";
+}
+
+TEST_F(Sfdisk, TheRestOfALargeDiskEndsWhereNumbersEnd)
+{
+    Resize(4096 * kGiB);
+    ASSERT_EQ(Run({"-M1"}).status, 0);
+    const Result loud = Run({"-N1", "-j256", "-z-1", "-t83"});
+    EXPECT_EQ(loud.status, 0);
+    EXPECT_THAT(loud.error, testing::HasSubstr("2^32"));
+    EXPECT_EQ(List(), "1 256 4294967295 4294967040 83 Linux\n");
+    EXPECT_EQ(Sector().substr(451, 3), "\xFE\xFF\xFF");
+    EXPECT_EQ(Run({"-N1", "-j256", "-z-1", "-t83", "-q"}).error, "");
+}
+
+TEST_F(Sfdisk, RefusesWhatItDoesNotKnow)
+{
+    const std::string before = Sector();
+    const std::vector<std::string> lines[] = {
+        {"-d"},
+        {"-l", "-uM"},
+        {"-A1"},
+        {"-M2"},
+        {"-M1", "-N1"},
+        {"-M1", "-l"},
+        {"-l", "-z1"},
+        {"-N1"},
+        {"-N0", "-z1", "-t83", "-j1"},
+        {"-N1x", "-z1", "-t83", "-j1"},
+        {"-N1", "-z1", "-t83"},
+        {"-N1", "-z1", "-j1"},
+        {"-N1", "-z1", "-j1", "-t0"},
+        {"-N1", "-z1", "-j1", "-t100"},
+        {"-N1", "-z1", "-j1", "-tgg"},
+        {"-N1", "-z-2", "-j1", "-t83"},
+        {"-N1", "-z1", "-j-1", "-t83"},
+        {"-N1", "-z1", "-j1", "-o1", "-t83"},
+        {"-N1", "-z1", "-j", "-t83"},
+        {"-N1", "-z18446744073709551616", "-j1", "-t83"},
+        {"-N1", "-z0", "-t83"},
+        {"--delete"},
+        {"-lq"},
+        {"-F"},
+        {},
+        {"-l", "/dev/null"},
+    };
+    for (const auto &words : lines) {
+        const Result result = Run(words);
+        EXPECT_EQ(result.status, 2) << testing::PrintToString(words);
+        EXPECT_THAT(result.error, testing::StartsWith("sfdisk: "));
+    }
+    EXPECT_EQ(Sector(), before);
+    EXPECT_EQ(Run({"--help"}).status, 0);
+    const std::string image = image_;
+    for (const char *no_disk : {"/dev/null", "/tmp", "/nowhere"}) {
+        image_ = no_disk;
+        EXPECT_EQ(Run({"-M1"}).status, 1) << no_disk;
+    }
+    image_ = dir_ / "fifo";
+    ASSERT_EQ(::mkfifo(image_.c_str(), 0600), 0);
+    EXPECT_EQ(Run({"-M1"}).status, 1) << "and does not wait";
+    image_ = image;
+}
+
+TEST_F(Sfdisk, ListsAndEmptiesLogicalPartitions)
+{
+    PutSector(0, Table({SmallEntry(0x83, 8, 8), SmallEntry(0x0F, 32, 96)}));
+    PutSector(32, Table({SmallEntry(0x83, 2, 10), SmallEntry(0x05, 32, 32)}));
+    PutSector(64, Table({SmallEntry(0x82, 3, 11), SmallEntry(0x05, 64, 32)}));
+    PutSector(96, Table({SmallEntry(0x8E, 4, 12), SmallEntry(0x05, 0, 32)}));  // back to the first: a circle
+    EXPECT_EQ(List(),
+              "1 8 15 8 83 Linux\n2 32 127 96 f Win95 Ext'd (LBA)\n5 34 43 10 83 Linux\n6 67 77 11 82 Linux swap\n"
+              "7 100 111 12 8e Linux LVM\n");
+    EXPECT_EQ(Run({"-N6", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0);
+    EXPECT_EQ(List({"-l", "-N6"}), "6 100 111 12 8e Linux LVM\n") << "the last moves up, as the kernel counts";
+    EXPECT_EQ(Sector(0), Table({SmallEntry(0x83, 8, 8), SmallEntry(0x0F, 32, 96)}));
+    EXPECT_EQ(Run({"-N7", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 1);
+    PutSector(32, std::string(512, 'r'));
+    EXPECT_EQ(List(), "1 8 15 8 83 Linux\n2 32 127 96 f Win95 Ext'd (LBA)\n") << "a broken chain ends there";
+}
+
+}  // namespace
