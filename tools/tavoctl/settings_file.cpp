@@ -54,6 +54,7 @@ void SettingsFile::DeclareSystem(Arguments &arguments, bool changes)
 
 void SettingsFile::DeclareAny(Arguments &arguments, bool changes)
 {
+    must_be_named_ = true;
     arguments.Option("--file", "PATH", path_, "the file; required");
     if (changes)
         arguments.Number("--timeout", "SECONDS", wait_,
@@ -64,6 +65,8 @@ const std::string &SettingsFile::Path()
 {
     if (defaults_ && !path_.empty())
         throw UsageFailure("choose a file", "--file and --defaults name two");
+    if (path_.empty() && must_be_named_)
+        throw UsageFailure("choose a file", "--file PATH is required");
     if (path_.empty())
         path_ = defaults_ ? defaults_file : settings_file;
     return path_;

@@ -37,6 +37,7 @@ class SettingsFile {
   private:
     std::string path_;
     bool defaults_ = false;
+    bool must_be_named_ = false;
     int wait_ = usual_wait;
 };
 

@@ -105,6 +105,12 @@ nlohmann::ordered_json Table::Json() const
     return rows;
 }
 
+// Not in the header: there the compiler for 32-bit ARM warns of parts of the fact that its kind does not have.
+void Record::Add(std::string name, Cell value)
+{
+    fields_.emplace_back(std::move(name), std::move(value));
+}
+
 std::string Record::Text() const
 {
     std::size_t width = 0;

@@ -50,7 +50,7 @@ class Table {
 
 class Record {
   public:
-    void Add(std::string name, Cell value) { fields_.emplace_back(std::move(name), std::move(value)); }
+    void Add(std::string name, Cell value);
 
     std::string Text() const;             // a field a line
     nlohmann::ordered_json Json() const;  // an object

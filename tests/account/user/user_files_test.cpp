@@ -9,7 +9,9 @@
 
 #include <functional>
 
-#include <sys/stat.h>
+#include <dlfcn.h>
+#include <pwd.h>
+#include <shadow.h>
 
 namespace {
 
@@ -110,6 +112,39 @@ TEST(UserFiles, EveryChangeInTurn)
     EXPECT_EQ(test::DeleteUser("CAROL"), 0);
     EXPECT_EQ(test::DeleteUser("j\xC3\x9CRGEN m"), 0);
     ExpectFiles("5-deleted");
+}
+
+// The system's own readers take every line, and a login with the password succeeds.
+TEST(UserFiles, TheSystemReadsThem)
+{
+    ASSERT_EQ(test::AddUser({.name = "alice", .password = "wonder:land", .description = "a:b"}), 0);
+    ASSERT_EQ(test::AddUser({.name = "J\xC3\xBCrgen M", .password = "", .expire = 20000, .cannot_change = true}), 0);
+    size_t accounts = 0;
+    ::setpwent();
+    while (::getpwent())
+        ++accounts;
+    ::endpwent();
+    EXPECT_EQ(accounts, test::Lines(test::FileText("/etc/passwd")).size());
+
+    const struct passwd *passwd = ::getpwnam("alice");
+    ASSERT_TRUE(passwd);
+    EXPECT_EQ(passwd->pw_uid, 1027u);
+    EXPECT_STREQ(passwd->pw_dir, "/var/services/homes/alice");
+    // The library that the tested one is linked with.
+    const auto crypt = reinterpret_cast<char *(*)(const char *, const char *)>(::dlsym(RTLD_DEFAULT, "crypt"));
+    ASSERT_TRUE(crypt);
+    const struct spwd *shadow = ::getspnam("alice");
+    ASSERT_TRUE(shadow);
+    EXPECT_STREQ(crypt("wonder:land", shadow->sp_pwdp), shadow->sp_pwdp);
+    EXPECT_STRNE(crypt("Wonder:land", shadow->sp_pwdp), shadow->sp_pwdp);
+    EXPECT_EQ(shadow->sp_max, 99999);
+    EXPECT_EQ(shadow->sp_expire, -1);
+    shadow = ::getspnam("J\xC3\xBCrgen M");
+    ASSERT_TRUE(shadow);
+    EXPECT_STREQ(crypt("", shadow->sp_pwdp), shadow->sp_pwdp);
+    EXPECT_EQ(shadow->sp_min, 100000);
+    EXPECT_EQ(shadow->sp_expire, 20000);
+    EXPECT_EQ(shadow->sp_warn, 7);
 }
 
 }  // namespace

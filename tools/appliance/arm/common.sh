@@ -61,6 +61,7 @@ END
 # Brings the lists up to date. A mirror in the middle of its own update may lack one of them; what is there will do,
 # and a package that cannot be found is reported by name later.
 arm_apt_update() {
+    mkdir -p "$arm_cache/apt"
     arm_apt apt-get -qq update >"$arm_cache/apt/update.log" 2>&1 ||
         say "some package lists did not come ($arm_cache/apt/update.log); going on with the others"
 }

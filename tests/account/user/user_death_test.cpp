@@ -1,0 +1,284 @@
+// A program that changes accounts dies: at every system call, at random moments, against others. What the next program
+// finds is the state before or after the change, whole, and no account that was committed is ever lost.
+#include "tavo_user.h"
+
+#include "account/user/user_fixture.h"
+#include "support/rounds.h"
+
+#include <gtest/gtest.h>
+
+#include <shadow.h>
+#include <signal.h>
+#include <sys/mman.h>
+#include <sys/ptrace.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <functional>
+#include <map>
+#include <random>
+#include <set>
+
+using test::AddUser;
+using test::AllFiles;
+using test::GetUser;
+
+namespace {
+
+// Runs `work` in a child that dies at its Nth system call. False when it came to its end instead.
+bool DiesAtCall(int n, const std::function<void()> &work)
+{
+    const pid_t child = ::fork();
+    if (child == 0) {
+        ::ptrace(PTRACE_TRACEME, 0, nullptr, nullptr);
+        ::raise(SIGSTOP);
+        work();
+        ::_exit(0);
+    }
+    int status = 0;
+    ::waitpid(child, &status, 0);
+    ::ptrace(PTRACE_SETOPTIONS, child, nullptr, reinterpret_cast<void *>(PTRACE_O_TRACESYSGOOD | PTRACE_O_EXITKILL));
+    for (int stops = 0; !WIFEXITED(status) && !WIFSIGNALED(status);) {
+        if (WIFSTOPPED(status) && WSTOPSIG(status) == (SIGTRAP | 0x80) && ++stops == 2 * n - 1) {
+            ::kill(child, SIGKILL);
+            ::waitpid(child, &status, 0);
+            return true;
+        }
+        ::ptrace(PTRACE_SYSCALL, child, nullptr, nullptr);
+        ::waitpid(child, &status, 0);
+    }
+    return false;
+}
+
+bool CanTrace()
+{
+    const pid_t child = ::fork();
+    if (child == 0)
+        ::_exit(::ptrace(PTRACE_TRACEME, 0, nullptr, nullptr) == 0 ? 0 : 1);
+    int status = 0;
+    ::waitpid(child, &status, 0);
+    return status == 0;
+}
+
+void RestoreFiles(const std::array<std::string, 4> &files)
+{
+    for (size_t i = 0; i < files.size(); ++i)
+        test::WriteFile(test::kAccountFiles[i], files[i]);
+}
+
+// The accounts that stand in the stores, as any program reads them.
+std::map<std::string, std::string> StoredPasswords()
+{
+    std::map<std::string, std::string> passwords;
+    for (const std::string &line : test::Lines(test::FileText("/etc/passwd"))) {
+        const std::string name = line.substr(0, line.find(':'));
+        const test::User user = GetUser(name);
+        passwords[name] = user ? user->szPasswd : "(none)";
+    }
+    return passwords;
+}
+
+void CheckFiles(const std::set<std::string> &committed)
+{
+    const auto lines = test::Lines(test::FileText("/etc/passwd"));
+    ASSERT_EQ(lines.at(0), "root:x:0:0:System administrator:/root:/bin/sh");
+    for (const std::string &line : lines)
+        ASSERT_EQ(std::count(line.begin(), line.end(), ':'), 6) << line;
+    const auto passwords = StoredPasswords();
+    for (const std::string &name : committed) {
+        for (const char *path : test::kAccountFiles)
+            ASSERT_NE(test::LineOf(path, name), "") << name << " in " << path;
+        ASSERT_TRUE(passwords.at(name).starts_with("$1$")) << name;
+    }
+    for (const auto &[name, password] : passwords)
+        ASSERT_NE(password, "(none)") << name;
+}
+
+TEST(UserDeath, AtEverySystemCall)
+{
+    if (!CanTrace())
+        GTEST_SKIP() << "no ptrace here";
+    for (const char *name : {"alice", "bob", "carol"})
+        ASSERT_EQ(AddUser({.name = name, .password = name}), 0);
+    const auto before = AllFiles();
+    const auto set = [] {
+        const test::User added = test::MakeUser({.name = "dave", .password = "d"});
+        const test::User renamed = test::MakeUser({.name = "robert", .password = "b"});
+        const test::User changed = test::MakeUser({.name = "carol", .password = "new"});
+        const TAVOUSER *users[] = {added.get(), renamed.get(), changed.get()};
+        const char *old_names[] = {nullptr, "bob", "carol"};
+        TAVOUserSet(old_names, users, 3);
+    };
+    const auto remove = [] {
+        const char *const names[] = {"alice", "carol"};
+        TAVOUserDelete(names, 2);
+    };
+    const std::function<void()> works[] = {set, remove};
+    for (const auto &work : works) {
+        RestoreFiles(before);
+        ASSERT_TRUE(GetUser("alice"));
+        work();
+        const auto after = AllFiles();
+        ASSERT_NE(before, after);
+        int calls = 0;
+        int kept = 0;
+        for (int n = 1;; ++n) {
+            RestoreFiles(before);
+            ASSERT_TRUE(GetUser("alice"));
+            if (!DiesAtCall(n, work))
+                break;
+            ++calls;
+            const bool alice = GetUser("alice") != nullptr;  // opens, and so repairs
+            const auto found = AllFiles();
+            ASSERT_TRUE(found == before || found == after) << "system call " << n;
+            kept += found == after ? 1 : 0;
+            ASSERT_EQ(alice, !test::LineOf("/etc/passwd", "alice").empty());
+            ASSERT_EQ(GetUser("robert") != nullptr, !test::LineOf("/etc/passwd", "robert").empty());
+            CheckFiles(alice ? std::set<std::string>{"alice"} : std::set<std::string>{});
+        }
+        EXPECT_GT(calls, 150);
+        EXPECT_GT(kept, 10) << "deaths behind the point of no return";
+    }
+}
+
+// What the child of the next test has committed and is about to change, in memory that outlives it.
+struct Journal {
+    volatile int done;
+    volatile bool busy;
+};
+
+TEST(UserDeath, AtRandomMoments)
+{
+    auto *journal = static_cast<Journal *>(
+        ::mmap(nullptr, sizeof(Journal), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0));
+    ASSERT_NE(journal, MAP_FAILED);
+    std::mt19937 random(7);
+    // Step s of the child: an account is added, renamed (its name says how often), and deleted two rounds later.
+    const auto step = [](int s) {
+        const std::string name = "user" + std::to_string(s / 3);
+        if (s % 3 == 0)
+            AddUser({.name = name, .password = "x"});
+        else if (s % 3 == 1)
+            test::Rename(name, name + "b");
+        else if (s >= 6)
+            test::DeleteUser("user" + std::to_string(s / 3 - 2) + "b");
+    };
+    const auto names_after = [](int s) {
+        std::set<std::string> names;
+        for (int i = 0; i < s; ++i) {
+            const std::string name = "user" + std::to_string(i / 3);
+            if (i % 3 == 0)
+                names.insert(name);
+            else if (i % 3 == 1)
+                names.erase(name), names.insert(name + "b");
+            else if (i >= 6)
+                names.erase("user" + std::to_string(i / 3 - 2) + "b");
+        }
+        return names;
+    };
+    int done = 0;
+    for (int round = 0; round < test::Rounds(2000); ++round) {
+        journal->done = done;
+        journal->busy = false;
+        const pid_t child = ::fork();
+        if (child == 0) {
+            for (int s = done;; ++s) {
+                journal->busy = true;
+                step(s);
+                journal->done = s + 1;
+                journal->busy = false;
+            }
+        }
+        ::usleep(useconds_t(random() % 15000));
+        ::kill(child, SIGKILL);
+        int status = 0;
+        ::waitpid(child, &status, 0);
+        done = journal->done;
+        // The step that was under way either happened or did not.
+        ASSERT_TRUE(GetUser("root"));
+        std::set<std::string> found;
+        for (const std::string &line : test::Lines(test::FileText("/etc/passwd")))
+            if (line.starts_with("user"))
+                found.insert(line.substr(0, line.find(':')));
+        if (found != names_after(done)) {
+            ASSERT_TRUE(journal->busy);
+            ASSERT_EQ(found, names_after(done + 1)) << "round " << round << " step " << done;
+            ++done;
+        }
+        ASSERT_NO_FATAL_FAILURE(CheckFiles(found));
+    }
+    ::munmap(journal, sizeof *journal);
+    EXPECT_GT(done, test::Rounds(2000) / 10);
+}
+
+// Each worker adds, renames and deletes accounts of its own; one more edits the files as the system's tools do, under
+// the system's lock. Whatever a worker was told has happened, has.
+TEST(UserConcurrency, WorkersAndTheSystemsTools)
+{
+    constexpr int workers = 16;
+    const int steps = test::Rounds(5000 / workers);
+    const auto until_unlocked = [](const std::function<int()> &change) {
+        int code = ERR_LOCK_FAILED;
+        for (int tries = 0; tries < 20 && code == ERR_LOCK_FAILED; ++tries)
+            code = change();
+        return code;
+    };
+    std::vector<pid_t> children;
+    for (int worker = 0; worker < workers; ++worker) {
+        children.push_back(::fork());
+        if (children.back() != 0)
+            continue;
+        for (int s = 0; s < steps; ++s) {
+            const std::string name = "w" + std::to_string(worker) + "_" + std::to_string(s / 3);
+            const int code = until_unlocked([&] {
+                return s % 3 == 0   ? AddUser({.name = name, .uid = 4000 + worker * 1000 + s})
+                       : s % 3 == 1 ? test::Rename(name, name + "r")
+                       : s % 2 == 0 ? test::DeleteUser(name + "r")
+                                    : 0;
+            });
+            if (code != 0)
+                ::_exit(1);
+        }
+        ::_exit(0);
+    }
+    children.push_back(::fork());
+    if (children.back() == 0) {
+        for (int s = 0; s < steps; ++s) {
+            if (::lckpwdf() != 0)
+                ::_exit(1);
+            const std::string passwd =
+                test::FileText("/etc/passwd") + "ext" + std::to_string(s) + ":x:900:100::/:/bin/sh\n";
+            test::WriteFile("/etc/passwd.ext", passwd);
+            std::filesystem::rename("/etc/passwd.ext", "/etc/passwd");
+            ::ulckpwdf();
+            ::usleep(20000);
+        }
+        ::_exit(0);
+    }
+    for (const pid_t child : children) {
+        int status = 0;
+        ::waitpid(child, &status, 0);
+        EXPECT_EQ(status, 0);
+    }
+    std::set<std::string> expected;
+    for (int worker = 0; worker < workers; ++worker)
+        for (int s = 0; s < steps; ++s) {
+            const std::string name = "w" + std::to_string(worker) + "_" + std::to_string(s / 3);
+            if (s % 3 == 0)
+                expected.insert(name);
+            else if (s % 3 == 1)
+                expected.erase(name), expected.insert(name + "r");
+            else if (s % 2 == 0)
+                expected.erase(name + "r");
+        }
+    for (int s = 0; s < steps; ++s)
+        expected.insert("ext" + std::to_string(s));
+    ASSERT_TRUE(GetUser("root"));
+    std::set<std::string> found;
+    for (const std::string &line : test::Lines(test::FileText("/etc/passwd")))
+        if (line.starts_with("w") || line.starts_with("ext"))
+            found.insert(line.substr(0, line.find(':')));
+    EXPECT_EQ(found, expected);
+}
+
+}  // namespace

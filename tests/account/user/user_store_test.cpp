@@ -1,0 +1,390 @@
+// The stores under /tmp are a cache: whatever happens to them, and to the text files behind the library's back, no
+// account is lost and nothing outside is touched.
+#include "tavo_user.h"
+
+#include "account/user/user_fixture.h"
+#include "support/captured_log.h"
+#include "support/fault_state.h"
+#include "support/rounds.h"
+
+#include <gtest/gtest.h>
+
+#include <dlfcn.h>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstring>
+#include <functional>
+#include <random>
+
+using test::AddUser;
+using test::AllFiles;
+using test::GetUser;
+
+namespace {
+
+constexpr std::array<const char *, 5> kStores{TAVO_USER_DB_NAME, TAVO_USER_DB_MISC, TAVO_USER_DB_SHADOW,
+                                              TAVO_USER_DB_SMB, TAVO_USER_DB_UID};
+
+// One call of one libc function that is to fail, as a full or broken disk makes it.
+struct Fault {
+    const char *function = nullptr;
+    int countdown = 0;
+    int reason = 0;
+} fault;
+
+bool Fails(const char *function)
+{
+    if (!fault.function || std::strcmp(fault.function, function) != 0 || --fault.countdown != 0)
+        return false;
+    errno = fault.reason;
+    return true;
+}
+
+template <class Function>
+Function *Next(const char *name)
+{
+    return reinterpret_cast<Function *>(::dlsym(RTLD_NEXT, name));
+}
+
+}  // namespace
+
+extern "C" {
+
+int fsync(int fd)
+{
+    return Fails("fsync") ? -1 : Next<int(int)>("fsync")(fd);
+}
+
+ssize_t write(int fd, const void *bytes, size_t count)
+{
+    return Fails("write") ? -1 : Next<ssize_t(int, const void *, size_t)>("write")(fd, bytes, count);
+}
+
+int rename(const char *from, const char *to)
+{
+    return Fails("rename") ? -1 : Next<int(const char *, const char *)>("rename")(from, to);
+}
+
+int fchown(int fd, uid_t uid, gid_t gid)
+{
+    return Fails("fchown") ? -1 : Next<int(int, uid_t, gid_t)>("fchown")(fd, uid, gid);
+}
+}
+
+namespace {
+
+void ForgetStores()
+{
+    for (const char *store : kStores)
+        std::filesystem::remove_all(store);
+    std::filesystem::remove_all("/tmp/.db.user.seal");
+}
+
+std::string ExternalEdit(const char *path, const std::string &line)
+{
+    const std::string text = test::FileText(path) + line + "\n";
+    test::WriteFile(path, text);
+    return text;
+}
+
+// Changes a byte in place, and makes sure that the file's time stamp has moved on: the kernel's clock for these ticks
+// only every few milliseconds.
+void FlipBit(const char *path, size_t at, int bit)
+{
+    struct stat before;
+    struct stat after;
+    ASSERT_EQ(::stat(path, &before), 0);
+    const int fd = ::open(path, O_RDWR | O_CLOEXEC);
+    char byte = 0;
+    const off_t place = off_t(at % size_t(before.st_size));
+    ASSERT_EQ(::pread(fd, &byte, 1, place), 1);
+    byte = char(byte ^ (1 << bit));
+    do {
+        ASSERT_EQ(::pwrite(fd, &byte, 1, place), 1);
+        ::stat(path, &after);
+    } while (std::memcmp(&before.st_ctim, &after.st_ctim, sizeof before.st_ctim) == 0);
+    ::close(fd);
+}
+
+TEST(UserStore, DamageOfEveryKind)
+{
+    for (int i = 0; i < 40; ++i)
+        ASSERT_EQ(AddUser({.name = "user" + std::to_string(i), .password = "x", .mail = "m"}), 0);
+    const auto files = AllFiles();
+    const std::string outside = "/var/outside";
+    test::WriteFile(outside, "precious\n", 0600);
+    std::mt19937 random(20240521);
+    const auto pick = [&](unsigned limit) {
+        return random() % limit;
+    };
+    const std::function<void(const char *)> damages[] = {
+        [](const char *store) { ::unlink(store); },
+        [&](const char *store) { ASSERT_EQ(::truncate(store, off_t(pick(9000))), 0); },
+        [&](const char *store) { FlipBit(store, random(), int(pick(8))); },
+        [&](const char *store) { test::WriteFile(store, std::string(pick(20000), char(random()))); },
+        [](const char *store) {
+            ::unlink(store);
+            ASSERT_EQ(::mkfifo(store, 0666), 0);
+        },
+        [&](const char *store) {
+            ::unlink(store);
+            ASSERT_EQ(::symlink(outside.c_str(), store), 0);
+        },
+        [](const char *store) {
+            ::unlink(store);
+            ASSERT_EQ(::mkdir(store, 0777), 0);
+            test::WriteFile(std::string(store) + "/in", "x");
+        },
+        [](const char *store) {
+            if (::chown(store, 1030, 100) != 0)  // only one user id is mapped here
+                ::unlink(store);
+        },
+        [&](const char *store) {
+            std::filesystem::copy_file(kStores[pick(5)], std::string(store) + ".x"),
+                ::rename((std::string(store) + ".x").c_str(), store);
+        },
+        [&](const char *) {
+            ::unlink("/tmp/.db.user.seal");
+            ASSERT_EQ(::symlink(outside.c_str(), "/tmp/.db.user.seal"), 0);
+        },
+        [](const char *) {
+            std::filesystem::remove_all("/tmp/.db.user.tmp");
+            ASSERT_EQ(::mkfifo("/tmp/.db.user.tmp", 0666), 0);
+            ::unlink("/tmp/.db.user.seal");
+        },
+        [&](const char *) {
+            ::symlink("/var", "/tmp/.db.user.tmp");
+            ::unlink("/tmp/.db.user.seal");
+        },
+    };
+    testing::internal::CaptureStderr();
+    for (int round = 0; round < test::Rounds(2000); ++round) {
+        const size_t kind = round < 60 ? size_t(round / 5) : pick(std::size(damages));
+        const char *store = kStores[round < 60 ? size_t(round % 5) : pick(5)];
+        damages[kind](store);
+        if (round % 3 == 0) {
+            ASSERT_TRUE(GetUser("USER17")) << kind << " " << store << " " << std::hex << TLIBErrGet();
+            ASSERT_EQ(TAVOUserTotalNum(TAVO_USER_LOCAL), 42) << kind << " " << store;
+        } else if (round % 3 == 1) {
+            ASSERT_EQ(AddUser({.name = "new"}), 0) << kind << " " << store;
+            ASSERT_EQ(test::DeleteUser("new"), 0);
+            ASSERT_EQ(test::Lines(test::FileText("/etc/passwd")).size(), test::Lines(files[0]).size())
+                << kind << " " << store;
+        } else {
+            ASSERT_EQ(GetUser("user3")->nUid, 1030) << kind << " " << store;
+        }
+        struct stat st;
+        ASSERT_TRUE(::lstat(store, &st) == 0 && S_ISREG(st.st_mode) && st.st_uid == 0) << kind;
+    }
+    EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
+    EXPECT_EQ(AllFiles()[0], files[0]);
+    EXPECT_EQ(AllFiles()[1], files[1]);
+    EXPECT_EQ(AllFiles()[3], files[3]);
+    EXPECT_EQ(test::ReadFile(outside), "precious\n");
+}
+
+// Somebody edits the files, in the same second as we wrote them or with an old time stamp: it is seen all the same.
+TEST(UserStore, EditsBehindTheLibrarysBack)
+{
+    ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
+    ExternalEdit("/etc/passwd", "extra:x:1500:100::/home/extra:/bin/sh");
+    ExternalEdit("/etc/shadow", "extra:*:19000:0:99999:7:::");
+    ASSERT_TRUE(GetUser("extra"));
+    EXPECT_STREQ(GetUser("extra")->szPasswd, "*");
+    struct stat st;
+    ASSERT_EQ(::stat("/etc/passwd", &st), 0);
+    const std::string replaced = [] {
+        std::string text = test::FileText("/etc/passwd");
+        return text.replace(text.find("/home/extra"), 11, "/HOME/extra");
+    }();
+    test::WriteFile("/etc/passwd", replaced);
+    const struct timespec times[2] = {st.st_atim, st.st_mtim};
+    ASSERT_EQ(::utimensat(AT_FDCWD, "/etc/passwd", times, 0), 0);
+    EXPECT_STREQ(GetUser("extra")->szHome, "/HOME/extra") << "same size, same modification time";
+    EXPECT_EQ(AddUser({.name = "bob"}), 0);
+    EXPECT_EQ(test::LineOf("/etc/passwd", "extra"), "extra:x:1500:100::/HOME/extra:/bin/sh");
+}
+
+// Accounts that share a user id, differ in case only, or have ids beyond the index survive every rewrite.
+TEST(UserStore, OddAccountsSurvive)
+{
+    for (const char *line :
+         {"toor:x:0:0::/root:/bin/sh", "Root:x:0:0::/root:/bin/sh", "big:x:4294967294:1::/:/bin/false",
+          "large:x:2000000:1::/:/bin/false", "pc$:x:1800:1::/:/bin/false"})
+        ExternalEdit("/etc/passwd", line);
+    ExternalEdit("/etc/shadow", "Root:mine:1:0:99999:7:::");
+    ASSERT_EQ(AddUser({.name = "alice"}), 0);
+    ForgetStores();
+    ASSERT_EQ(AddUser({.name = "bob", .uid = 1800}), 0);
+    std::vector<std::string> ids;
+    for (const std::string &line : test::Lines(test::FileText("/etc/passwd"))) {
+        const size_t begin = line.find(":x:") + 3;
+        ids.push_back(line.substr(0, line.find(':')) + " " + line.substr(begin, line.find(':', begin) - begin));
+    }
+    EXPECT_EQ(ids, (std::vector<std::string>{"root 0", "Root 0", "toor 0", "lp 7", "ftp 21", "anonymous 21", "smmsp 25",
+                                             "postgres 55", "nobody 1023", "admin 1024", "guest 1025", "alice 1027",
+                                             "pc$ 1800", "bob 1800", "large 2000000", "big 4294967294"}));
+    EXPECT_EQ(test::LineOf("/etc/shadow", "Root"), "Root:mine:1:0:99999:7:::");
+    EXPECT_EQ(test::LineOf("/etc/shadow", "root"), "root:*:14600:0:99999:7:::");
+    TAVOUSER *user = nullptr;
+    ASSERT_EQ(TAVOUserGetByUID(2000000, &user), 0);
+    EXPECT_STREQ(user->szName, "large");
+    TAVOUserFree(user);
+    ASSERT_EQ(test::DeleteUser("pc$"), 0);
+    user = nullptr;
+    ASSERT_EQ(TAVOUserGetByUID(1800, &user), 0) << "the one that is left";
+    EXPECT_STREQ(user->szName, "bob");
+    TAVOUserFree(user);
+}
+
+// Nothing is there at all: a start from nothing. Later files appear beside.
+TEST(UserStore, EmptyStart)
+{
+    for (const char *path : test::kAccountFiles)
+        ::unlink(path);
+    EXPECT_FALSE(GetUser("admin"));
+    ASSERT_EQ(std::filesystem::remove_all("/usr/tavo/etc/private"), 1u);
+    ASSERT_EQ(AddUser({.name = "first"}), 0);
+    EXPECT_EQ(test::FileText("/etc/passwd"), "first:x:1024:100::/var/services/homes/first:/bin/csh\n");
+    const struct {
+        const char *path;
+        unsigned mode;
+    } rows[] = {{"/etc/passwd", 0644},
+                {"/etc/shadow", 0600},
+                {"/etc/tavouser.conf", 0644},
+                {"/usr/tavo/etc/private/smbpasswd", 0600}};
+    for (const auto &row : rows) {
+        struct stat st;
+        ASSERT_EQ(::stat(row.path, &st), 0);
+        EXPECT_EQ(st.st_mode & 07777, row.mode) << row.path;
+    }
+    ASSERT_EQ(::chmod("/etc/shadow", 0640), 0);
+    if (::chown("/etc/shadow", 0, 42) != 0)
+        GTEST_SKIP() << "only one user id is mapped here";
+    ASSERT_EQ(AddUser({.name = "second"}), 0);
+    struct stat st;
+    ASSERT_EQ(::stat("/etc/shadow", &st), 0);
+    EXPECT_EQ(st.st_mode & 07777, 0640u);
+    EXPECT_EQ(st.st_gid, 42u);
+}
+
+// A program with handles of its own: what it deletes it may write, but stores that lack an account are not written.
+TEST(UserStore, DumpNeverLosesAnAccount)
+{
+    ASSERT_EQ(AddUser({.name = "alice"}), 0);
+    ASSERT_EQ(AddUser({.name = "bob"}), 0);
+    const auto before = AllFiles();
+    const auto open = [] {
+        TAVOBDB *stores[5];
+        for (size_t i = 0; i < 5; ++i)
+            stores[i] = TAVOBDbOpen(kStores[i], O_RDWR, 1);
+        return TAVOUSERDB{stores[0], stores[1], stores[2], stores[3], stores[4]};
+    };
+    const auto close = [](const TAVOUSERDB &db) {
+        for (TAVOBDB *store : {db.pName, db.pMisc, db.pShadow, db.pSmb, db.pUid})
+            EXPECT_EQ(TAVOBDbClose(store), 0);
+    };
+    TAVOUSERDB db = open();
+    EXPECT_EQ(TAVOBDbDelete(db.pName, "ALICE", 6), 0);
+    close(db);
+    db = open();
+    EXPECT_EQ(TAVOUserDBDump(&db), -1);
+    EXPECT_EQ(test::LastFault(), (test::Fault{ERR_WRITE_FAILED, "user_db_dump"}));
+    EXPECT_EQ(AllFiles(), before);
+    EXPECT_EQ(TAVOBDbDelete(db.pName, "BOB", 4), 0);
+    EXPECT_EQ(TAVOBDbSet(db.pName, "ALICE", 6, "alice:x:1027:100::/:/bin/csh", 29), 0);
+    EXPECT_EQ(TAVOUserDBDump(&db), 0);
+    EXPECT_EQ(test::LineOf("/etc/passwd", "bob"), "");
+    EXPECT_EQ(test::LineOf("/etc/passwd", "alice"), "alice:x:1027:100::/:/bin/csh");
+    const test::User carol = test::MakeUser({.name = "carol", .uid = 1200, .gid = 100});
+    EXPECT_EQ(TAVOUserDBSet(&db, "ALICE", carol.get()), 0);
+    EXPECT_EQ(TAVOUserDBSet(&db, nullptr, carol.get()), -1);
+    EXPECT_EQ(test::LastFault(), (test::Fault{ERR_USER_EXISTS, "user_db_set"}));
+    EXPECT_EQ(TAVOUserDBDump(&db), 0);
+    EXPECT_EQ(TAVOUserDBGetFreeUid(&db), 1029);
+    close(db);
+    EXPECT_TRUE(GetUser("carol"));
+    EXPECT_FALSE(GetUser("alice"));
+    EXPECT_EQ(TAVOUserDBDump(nullptr), -1);
+    EXPECT_EQ(TAVOUserDBGetFreeUid(nullptr), -1);
+}
+
+// Each write, sync, rename and change of owner fails once: the code, the old files, and the next change works.
+TEST(UserStore, DisksThatFail)
+{
+    ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
+    const struct {
+        const char *function;
+        int reason;
+        int code;
+    } rows[] = {
+        {"write", ENOSPC, ERR_NOT_ENOUGH_SPACE}, {"write", EIO, ERR_WRITE_FAILED},    {"fsync", EIO, ERR_WRITE_FAILED},
+        {"fsync", EDQUOT, ERR_NOT_ENOUGH_SPACE}, {"fchown", EPERM, ERR_WRITE_FAILED},
+    };
+    for (const auto &row : rows) {
+        const auto before = AllFiles();
+        int failed = 0;
+        for (int call = 1;; ++call) {
+            const test::User user = test::MakeUser({.name = "bob", .password = "y"});
+            const TAVOUSER *record = user.get();
+            const char *none = nullptr;
+            fault = {row.function, call, row.reason};
+            const int result = TAVOUserSet(&none, &record, 1);
+            const bool hit = fault.countdown <= 0;
+            fault = {};
+            if (!hit || result == 0)
+                break;  // beyond the last one, or one that does not matter any more
+            ++failed;
+            EXPECT_EQ(test::LastFault(), (test::Fault{row.code, "user_db_dump"})) << row.function << " " << call;
+            EXPECT_EQ(AllFiles(), before) << row.function << " " << call;
+            for (const char *path : test::kAccountFiles)
+                EXPECT_NE(::access((std::string(path) + ".tmp").c_str(), F_OK), 0) << path;
+            EXPECT_FALSE(GetUser("bob")) << row.function << " " << call;
+        }
+        EXPECT_GE(failed, std::strcmp(row.function, "fchown") == 0 ? 4 : 5) << row.function;
+        ASSERT_EQ(test::DeleteUser("bob"), 0);
+    }
+}
+
+// The first of the four renames fails: nothing has happened. A later one fails: the next call finishes what was begun.
+TEST(UserStore, RenamesThatFail)
+{
+    ASSERT_TRUE(GetUser("admin"));  // the stores are there: the renames that follow are those of the files
+    for (int call = 1; call <= 4; ++call) {
+        const auto before = AllFiles();
+        const std::string name = "user" + std::to_string(call);
+        fault = {"rename", call, EIO};
+        EXPECT_EQ(AddUser({.name = name, .password = "x"}), ERR_RENAME_FAILED) << call;
+        fault = {};
+        EXPECT_TRUE(call > 1 || AllFiles() == before);
+        EXPECT_EQ(GetUser(name) != nullptr, call > 1) << call;
+        for (const char *path : test::kAccountFiles)
+            EXPECT_EQ(!test::LineOf(path, name).empty(), call > 1) << path << " " << call;
+    }
+}
+
+TEST(UserStore, ModeOfTheStores)
+{
+    const auto mode = [] {
+        struct stat st = {};
+        ::stat(TAVO_USER_DB_SHADOW, &st);
+        return st.st_mode & 07777;
+    };
+    ASSERT_EQ(AddUser({.name = "a"}), 0);
+    EXPECT_EQ(mode(), 0666u);
+    test::WriteFile("/etc.defaults/tavoinfo.conf", "account_store_mode=\"0600\"\n");
+    ForgetStores();
+    ASSERT_EQ(AddUser({.name = "b"}), 0);
+    EXPECT_EQ(mode(), 0600u);
+    for (const char *bad : {"0777", "4666", "066", "x", ""}) {
+        test::WriteFile("/etc.defaults/tavoinfo.conf", std::string("account_store_mode=") + bad + "\n");
+        ForgetStores();
+        ASSERT_TRUE(GetUser("a"));
+        EXPECT_EQ(mode(), 0666u) << bad;
+    }
+}
+
+}  // namespace

@@ -1,0 +1,313 @@
+// What all verbs of tavoctl share: exit statuses, refusals, tables and JSON, failures, questions, completion.
+#include "run_tavoctl.h"
+
+#include "support/scratch_dir.h"
+
+#include "tavo_error.h"
+
+#include <gmock/gmock.h>
+#include <nlohmann/json.hpp>
+
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+
+namespace {
+
+using nlohmann::json;
+using test::ReadFile;
+using test::ScratchDir;
+using test::Tavoctl;
+using test::TavoctlAtTerminal;
+using test::Words;
+using test::WriteFile;
+using testing::AllOf;
+using testing::HasSubstr;
+using testing::Not;
+using testing::StartsWith;
+
+std::vector<std::string> Lines(const std::string &text)
+{
+    std::vector<std::string> lines;
+    std::istringstream in(text);
+    for (std::string line; std::getline(in, line);)
+        lines.push_back(line);
+    return lines;
+}
+
+// tavoctl is a program of its own: where only the entering program can start one, there is nothing to test.
+class NeedsPrograms : public testing::Environment {
+    void SetUp() override
+    {
+        if (test::RootLacks("foreign-exec"))
+            GTEST_SKIP() << "no program can be started here";
+    }
+};
+[[maybe_unused]] const testing::Environment *const needs = testing::AddGlobalTestEnvironment(new NeedsPrograms);
+
+TEST(TavoctlFrame, WrongCommandLinesAreUsageAndSayNothingOnStandardOutput)
+{
+    const Words lines[] = {
+        {},
+        {"nonsense"},
+        {"conf"},
+        {"conf", "nonsense"},
+        {"conf", "get"},
+        {"conf", "get", "a", "b"},
+        {"conf", "get", "--nonsense", "a"},
+        {"conf", "get", "--file"},
+        {"conf", "get", "--file", "/etc/hosts", "--defaults", "a"},
+        {"conf", "set", "key"},
+        {"conf", "set", "--timeout", "soon", "key", "value"},
+        {"conf", "set", "--timeout", "-1", "key", "value"},
+        {"conf", "set", "bad=key", "value"},
+        {"conf", "set", "key", "two\nlines"},
+        {"section", "list"},
+        {"section", "set", "--file", "/etc/tavoinfo.conf", "name"},
+        {"section", "add", "--file", "/tmp/new", "name", "no pair"},
+        {"section", "add", "--file", "/tmp/new", "bad]name", "a=b"},
+        {"lock", "run", "tavoinfo"},
+        {"lock", "run", "nonsense", "--", "true"},
+        {"lock", "run", "0x806", "--", "true"},
+        {"lock", "run", "0", "--", "true"},
+        {"proc", "run"},
+        {"proc", "run", "--timeout", "0", "true"},
+        {"proc", "signal", "/tmp/pid", "NONSENSE"},
+        {"error", "explain"},
+    };
+    for (const Words &words : lines) {
+        const test::Ran ran = Tavoctl(words);
+        EXPECT_EQ(ran.status, 2) << testing::PrintToString(words) << ran;
+        EXPECT_EQ(ran.out, "") << testing::PrintToString(words);
+        EXPECT_EQ(Lines(ran.err).size(), 1u) << testing::PrintToString(words) << ran.err;
+    }
+    EXPECT_FALSE(std::filesystem::exists("/tmp/new"));
+}
+
+TEST(TavoctlFrame, EveryVerbHasHelpWithAnExample)
+{
+    const auto names = [](Words before) {
+        before.insert(before.begin(), "--complete");
+        before.emplace_back("");
+        return Lines(Tavoctl(before).out);
+    };
+    int verbs = 0;
+    for (const std::string &family : names({})) {
+        EXPECT_THAT(Tavoctl({"--help"}).out, HasSubstr("  " + family + " "));
+        std::vector<std::string> found = names({family});
+        if (found.empty())
+            found = {""};
+        for (const std::string &verb : found) {
+            const test::Ran ran = verb.empty() ? Tavoctl({family, "--help"}) : Tavoctl({family, verb, "--help"});
+            const std::string command = "tavoctl " + family + (verb.empty() ? "" : " " + verb);
+            EXPECT_EQ(ran.status, 0) << command;
+            EXPECT_THAT(ran.out, AllOf(StartsWith("usage: " + command), HasSubstr("Examples:\n  " + command)));
+            ++verbs;
+        }
+    }
+    EXPECT_GE(verbs, 19);
+}
+
+TEST(TavoctlFrame, FailureNamesCodePlaceAttemptAndHintOnOneLine)
+{
+    const test::Ran text = Tavoctl({"conf", "get", "no_such_key"});
+    EXPECT_EQ(text.status, 3);
+    EXPECT_THAT(text.err, StartsWith("tavoctl: cannot get no_such_key from /etc/tavoinfo.conf: ERR_KEY_NOT_FOUND "
+                                     "(0x2000) at file_get_key_value:108; "));
+    EXPECT_EQ(Lines(text.err).size(), 1u);
+
+    const test::Ran ran = Tavoctl({"conf", "get", "--json", "no_such_key"});
+    EXPECT_EQ(ran.status, 3);
+    EXPECT_EQ(ran.out, "");
+    const json error = json::parse(ran.err).at("error");
+    EXPECT_EQ(error.at("code"), "0x2000");
+    EXPECT_EQ(error.at("name"), "ERR_KEY_NOT_FOUND");
+    EXPECT_EQ(error.at("module"), "file_get_key_value");
+    EXPECT_EQ(error.at("line"), 108);
+    EXPECT_EQ(error.at("status"), 3);
+    EXPECT_EQ(error.at("attempted"), "get no_such_key from /etc/tavoinfo.conf");
+    EXPECT_NE(error.at("hint"), "");
+}
+
+TEST(TavoctlFrame, ForeignMachineIsNotChanged)
+{
+    const ScratchDir dir;
+    const std::string before = ReadFile("/etc/tavoinfo.conf");
+    const std::string aside = dir / "defaults";
+    std::filesystem::copy_file("/etc.defaults/tavoinfo.conf", aside);
+    std::filesystem::remove("/etc.defaults/tavoinfo.conf");
+    const Words lines[] = {
+        {"conf", "set", "key", "value"},
+        {"conf", "append", "key", "value"},
+        {"conf", "remove", "runsamba"},
+        {"conf", "comment", "runsamba"},
+        {"section", "add", "--file", dir / "sections", "name", "a=b"},
+        {"section", "remove", "--yes", "--file", "/etc/tavoinfo.conf", "name"},
+        {"lock", "run", "tavoinfo", "--", "/bin/touch", dir / "ran"},
+        {"proc", "run", "/bin/touch", dir / "ran"},
+    };
+    for (const Words &words : lines) {
+        const test::Ran ran = Tavoctl(words);
+        EXPECT_EQ(ran.status, 1) << testing::PrintToString(words);
+        EXPECT_THAT(ran.err, HasSubstr("--force-host"));
+    }
+    EXPECT_EQ(ReadFile("/etc/tavoinfo.conf"), before);
+    EXPECT_EQ(dir.Names(), std::vector<std::string>{"defaults"});
+
+    // Looking is allowed, and so is meaning it.
+    EXPECT_EQ(Tavoctl({"conf", "set", "--dry-run", "key", "value"}).status, 0);
+    EXPECT_EQ(json::parse(Tavoctl({"version", "--json"}).out).at("appliance"), false);
+    EXPECT_EQ(ReadFile("/etc/tavoinfo.conf"), before);
+    EXPECT_EQ(Tavoctl({"conf", "set", "--force-host", "key", "value"}).status, 0);
+    EXPECT_EQ(ReadFile("/etc/tavoinfo.conf"), before + "key=value\n");
+
+    std::filesystem::copy_file(aside, "/etc.defaults/tavoinfo.conf");
+    WriteFile("/etc/tavoinfo.conf", before);
+}
+
+TEST(TavoctlFrame, ColumnsAlignByCharacters)
+{
+    const ScratchDir dir;
+    WriteFile(dir / "f", "k=v\nschl\xC3\xBCssel=gr\xC3\xB6\xC3\x9F"
+                         "e\n# comment\nlong_key_name=\n");
+    EXPECT_EQ(Tavoctl({"conf", "list", "--file", dir / "f"}).out, "LINE  KEY            VALUE\n"
+                                                                  "   1  k              v\n"
+                                                                  "   2  schl\xC3\xBCssel      gr\xC3\xB6\xC3\x9F"
+                                                                  "e\n"
+                                                                  "   4  long_key_name  \n");
+    WriteFile(dir / "f", "# nothing\n");
+    EXPECT_EQ(Tavoctl({"conf", "list", "--file", dir / "f"}).out, "");
+    EXPECT_EQ(json::parse(Tavoctl({"conf", "list", "--json", "--file", dir / "f"}).out), json::array());
+}
+
+TEST(TavoctlFrame, ControlCharactersNeverReachATerminal)
+{
+    const ScratchDir dir;
+    if (test::RootLacks("pts"))
+        GTEST_SKIP() << "no terminals here";
+    // Escape, a C1 control, bytes that are no UTF-8, an override of direction, delete.
+    const std::string value = "a\x1b[31mb\xC2\x9B"
+                              "2Jc\xFF\xC0\x80"
+                              "d\xE2\x80\xAE"
+                              "e\x7F";
+    const std::string shown = R"(a\x1b[31mb\xc2\x9b2Jc\xff\xc0\x80d\xe2\x80\xaee\x7f)";
+    WriteFile(dir / "f", "k=" + value + "\n");
+    const Words get = {"conf", "get", "--file", dir / "f", "k"};
+    const Words list = {"conf", "list", "--file", dir / "f"};
+
+    EXPECT_EQ(TavoctlAtTerminal(get).out, shown + "\r\n");
+    EXPECT_EQ(Tavoctl(get).out, value + "\n");  // a script gets the bytes
+    EXPECT_THAT(Tavoctl(list).out, HasSubstr(shown));
+    EXPECT_EQ(TavoctlAtTerminal({"conf", "set", "--dry-run", "--file", dir / "f", "n", "\x1b[0m"}).out.find('\x1b'),
+              std::string::npos);
+    EXPECT_THAT(Tavoctl({"conf", "get", "--file", dir / "f", "\x1b]0;x\x07"}).err,
+                AllOf(HasSubstr(R"(\x1b]0;x\x07)"), Not(HasSubstr("\x1b"))));
+
+    Words as_json = get;
+    as_json.emplace_back("--json");
+    const std::string text = Tavoctl(as_json).out;
+    for (const char c : text)
+        EXPECT_TRUE(c == '\n' || (c >= ' ' && c < 0x7F)) << static_cast<int>(c);
+    EXPECT_THAT(json::parse(text).at("value").get<std::string>(), StartsWith("a\x1b[31mb"));
+}
+
+TEST(TavoctlFrame, QuestionsAreAskedAtATerminalOnly)
+{
+    const ScratchDir dir;
+    if (test::RootLacks("pts"))
+        GTEST_SKIP() << "no terminals here";
+    const std::string text = "[a]\nk=v\n[b]\nk=v\n";
+    const Words remove = {"section", "remove", "--file", dir / "f", "b"};
+
+    WriteFile(dir / "f", text);
+    EXPECT_EQ(Tavoctl(remove).status, 2);
+    EXPECT_EQ(ReadFile(dir / "f"), text);
+    for (const char *answer : {"n\n", "\n", "maybe\n"}) {
+        const test::Ran ran = TavoctlAtTerminal(remove, answer);
+        EXPECT_EQ(ran.status, 1) << answer;
+        EXPECT_THAT(ran.out, HasSubstr("Remove section [b] of " + dir / "f" + "? [y/N] "));
+        EXPECT_EQ(ReadFile(dir / "f"), text) << answer;
+    }
+    EXPECT_EQ(TavoctlAtTerminal(remove, "y\n").status, 0);
+    EXPECT_EQ(ReadFile(dir / "f"), "[a]\nk=v\n");
+
+    WriteFile(dir / "f", text);
+    EXPECT_EQ(Tavoctl({"section", "remove", "--yes", "--file", dir / "f", "b"}).status, 0);
+    EXPECT_EQ(ReadFile(dir / "f"), "[a]\nk=v\n");
+}
+
+TEST(TavoctlFrame, AnAnswerThatCannotBeWrittenIsAFailure)
+{
+    const int status = std::system("/usr/bin/tavoctl conf list >/dev/full 2>/dev/null");
+    EXPECT_EQ(test::ShellStatus(status), 1);
+}
+
+TEST(TavoctlFrame, ErrorCodesAreTheLibrarysOwn)
+{
+    const json list = json::parse(Tavoctl({"error", "list", "--json"}).out);
+    std::vector<bool> listed(static_cast<std::size_t>(errNum));
+    for (const json &row : list) {
+        const int code = std::stoi(row.at("code").get<std::string>(), nullptr, 16);
+        EXPECT_EQ(code % 0x100, 0);
+        EXPECT_NE(row.at("meaning"), "");
+        const auto index = static_cast<std::size_t>(code / 0x100);
+        if (index >= listed.size())
+            continue;
+        listed[index] = true;
+        // A code whose slot is empty has its name from the header only.
+        const std::string name = rgszErrMsg[index];
+        EXPECT_TRUE(name.empty() || row.at("name") == name) << row << name;
+    }
+    for (std::size_t i = 0; i < listed.size(); ++i)
+        EXPECT_TRUE(listed[i] || !*rgszErrMsg[i]) << rgszErrMsg[i];
+
+    const json explained = json::parse(Tavoctl({"error", "explain", "--json", "0x0400"}).out);
+    EXPECT_EQ(explained.at("name"), "ERR_LOCK_FAILED");
+    for (const char *form : {"1024", "0X400", "ERR_LOCK_FAILED", "err_lock_failed", "Lock_Failed"})
+        EXPECT_EQ(json::parse(Tavoctl({"error", "explain", "--json", form}).out), explained) << form;
+    for (const char *form : {"0x0401", "-1024", "0x", "1024 ", "ERR_", "99999999999"})
+        EXPECT_EQ(Tavoctl({"error", "explain", "--", form}).status, 3) << form;
+}
+
+TEST(TavoctlFrame, VersionNamesMachineAndLibrary)
+{
+    const json version = json::parse(Tavoctl({"version", "--json"}).out);
+    EXPECT_EQ(version.at("machine").get<std::string>() + "\n", [] {
+        std::ifstream in("/proc/sys/kernel/arch");
+        std::ostringstream arch;
+        arch << in.rdbuf();
+        return sizeof(void *) == 8 && in.is_open() ? arch.str() : "armv7l\n";
+    }());
+    EXPECT_THAT(version.at("library_file").get<std::string>(), HasSubstr("libtavosdk.so.1"));
+    EXPECT_THAT(version.at("library").get<std::string>(), StartsWith("1"));
+    EXPECT_EQ(version.at("appliance"), true);
+    EXPECT_EQ(Tavoctl({"--version"}).out, Tavoctl({"version"}).out);
+}
+
+TEST(TavoctlFrame, CompletionKnowsVerbsOptionsAndNames)
+{
+    const struct {
+        Words words;
+        const char *expected;
+    } cases[] = {
+        {{"er"}, "error\n"},
+        {{"conf", "co"}, "comment\n"},
+        {{"conf", "get", "--de"}, "--defaults\n"},
+        {{"conf", "get", "runsam"}, "runsamba\n"},
+        {{"conf", "get", "--file", "runsam"}, ""},
+        {{"conf", "get", "--file", "/etc/x", "runsam"}, "runsamba\n"},
+        {{"conf", "get", "runsamba", "run"}, ""},
+        {{"lock", "run", "--timeout", "5", "tavo"}, "tavoinfo\n"},
+        {{"error", "explain", "ERR_KEY_N"}, "ERR_KEY_NOT_FOUND\n"},
+        {{"proc", "signal", "/tmp/pid", "HU"}, "HUP\n"},
+        {{"version", "--j"}, "--json\n"},
+        {{"nonsense", "ge"}, ""},
+    };
+    for (const auto &[words, expected] : cases) {
+        Words line = {"--complete"};
+        line.insert(line.end(), words.begin(), words.end());
+        EXPECT_EQ(Tavoctl(line).out, expected) << testing::PrintToString(words);
+    }
+}
+
+}  // namespace

@@ -1,0 +1,155 @@
+// Runs tavoctl, as it is installed in the appliance root, and keeps what it said.
+#ifndef TESTS_TOOLS_TAVOCTL_RUN_TAVOCTL_H
+#define TESTS_TOOLS_TAVOCTL_RUN_TAVOCTL_H
+
+#include <gtest/gtest.h>
+
+#include <csignal>
+#include <cstdlib>
+#include <ostream>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+#include <fcntl.h>
+#include <poll.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace test {
+
+using Words = std::vector<std::string>;
+
+struct Ran {
+    int status;  // 128 and the signal for a death by one
+    std::string out;
+    std::string err;
+};
+
+// Whether the way in which the root was entered leaves this out.
+inline bool RootLacks(std::string_view what)
+{
+    const char *lacks = std::getenv("TAVO_ROOT_LACKS");
+    return lacks && ("," + std::string(lacks) + ",").find("," + std::string(what) + ",") != std::string::npos;
+}
+
+inline std::ostream &operator<<(std::ostream &out, const Ran &ran)
+{
+    return out << "exit status " << ran.status << "\n" << ran.out << ran.err;
+}
+
+inline int ShellStatus(int status)
+{
+    return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
+}
+
+[[noreturn]] inline void BecomeTavoctl(const Words &words)
+{
+    std::vector<char *> arguments = {const_cast<char *>("tavoctl")};
+    for (const std::string &word : words)
+        arguments.push_back(const_cast<char *>(word.c_str()));
+    arguments.push_back(nullptr);
+    ::execv("/usr/bin/tavoctl", arguments.data());
+    ::_exit(125);
+}
+
+// A tavoctl that is still running. Its outputs are pipes.
+class RunningTavoctl {
+  public:
+    explicit RunningTavoctl(const Words &words)
+    {
+        int out[2];
+        int err[2];
+        EXPECT_EQ(::pipe2(out, O_CLOEXEC), 0);
+        EXPECT_EQ(::pipe2(err, O_CLOEXEC), 0);
+        pid_ = ::fork();
+        if (pid_ == 0) {
+            ::dup2(::open("/dev/null", O_RDONLY), 0);
+            ::dup2(out[1], 1);
+            ::dup2(err[1], 2);
+            BecomeTavoctl(words);
+        }
+        ::close(out[1]);
+        ::close(err[1]);
+        out_ = out[0];
+        err_ = err[0];
+    }
+    ~RunningTavoctl()
+    {
+        if (pid_ > 0)
+            Wait();
+    }
+    RunningTavoctl(const RunningTavoctl &) = delete;
+    RunningTavoctl &operator=(const RunningTavoctl &) = delete;
+
+    pid_t Pid() const { return pid_; }
+
+    Ran Wait()
+    {
+        Ran ran = {};
+        pollfd ends[] = {{out_, POLLIN, 0}, {err_, POLLIN, 0}};
+        std::string *texts[] = {&ran.out, &ran.err};
+        while (ends[0].fd >= 0 || ends[1].fd >= 0) {
+            if (::poll(ends, 2, -1) < 0)
+                continue;
+            for (int i = 0; i < 2; ++i) {
+                if (ends[i].fd < 0 || !ends[i].revents)
+                    continue;
+                char bytes[4096];
+                const ssize_t count = ::read(ends[i].fd, bytes, sizeof bytes);
+                if (count > 0)
+                    texts[i]->append(bytes, static_cast<std::size_t>(count));
+                else
+                    ::close(std::exchange(ends[i].fd, -1));
+            }
+        }
+        int status = 0;
+        ::waitpid(std::exchange(pid_, -1), &status, 0);
+        ran.status = ShellStatus(status);
+        return ran;
+    }
+
+  private:
+    pid_t pid_;
+    int out_;
+    int err_;
+};
+
+inline Ran Tavoctl(const Words &words)
+{
+    return RunningTavoctl(words).Wait();
+}
+
+// At a terminal: the person there types `typed`; everything shown comes back as it was sent.
+inline Ran TavoctlAtTerminal(const Words &words, const std::string &typed = {})
+{
+    const int master = ::posix_openpt(O_RDWR | O_NOCTTY | O_CLOEXEC);
+    EXPECT_GE(master, 0);
+    EXPECT_EQ(::grantpt(master), 0);
+    EXPECT_EQ(::unlockpt(master), 0);
+    const std::string name = ::ptsname(master);
+    const int terminal = ::open(name.c_str(), O_RDWR | O_NOCTTY | O_CLOEXEC);
+    EXPECT_GE(terminal, 0) << name;
+    const pid_t pid = ::fork();
+    if (pid == 0) {
+        for (int fd = 0; fd < 3; ++fd)
+            ::dup2(terminal, fd);
+        BecomeTavoctl(words);
+    }
+    ::close(terminal);
+    EXPECT_EQ(::write(master, typed.data(), typed.size()), static_cast<ssize_t>(typed.size()));
+    Ran ran = {};
+    char bytes[4096];
+    for (ssize_t count; (count = ::read(master, bytes, sizeof bytes)) > 0;)
+        ran.out.append(bytes, static_cast<std::size_t>(count));
+    ::close(master);
+    int status = 0;
+    ::waitpid(pid, &status, 0);
+    ran.status = ShellStatus(status);
+    return ran;
+}
+
+}  // namespace test
+
+#endif
