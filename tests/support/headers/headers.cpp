@@ -1,0 +1,1 @@
+// Exists so that the headers which every test includes are compiled once.
