@@ -237,7 +237,7 @@ TEST(UserConcurrency, WorkersAndTheSystemsTools)
                                     : 0;
             });
             if (code != 0)
-                ::_exit(1);
+                ::_exit(code / 0x100);
         }
         ::_exit(0);
     }
@@ -258,7 +258,8 @@ TEST(UserConcurrency, WorkersAndTheSystemsTools)
     for (const pid_t child : children) {
         int status = 0;
         ::waitpid(child, &status, 0);
-        EXPECT_EQ(status, 0);
+        EXPECT_EQ(WIFEXITED(status) ? WEXITSTATUS(status) * 0x100 : status, 0)
+            << "the code of what a worker could not do";
     }
     std::set<std::string> expected;
     for (int worker = 0; worker < workers; ++worker)

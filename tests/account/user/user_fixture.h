@@ -77,7 +77,7 @@ inline int Rename(const std::string &old_name, const std::string &new_name)
 {
     const User old = GetUser(old_name);
     if (!old)
-        return ERR_NO_SUCH_USER;
+        return TLIBErrGet();
     TAVOUSER renamed = *old;
     renamed.szName = const_cast<char *>(new_name.c_str());
     return SetUser(old_name, &renamed);

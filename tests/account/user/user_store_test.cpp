@@ -114,6 +114,7 @@ TEST(UserStore, DamageOfEveryKind)
     for (int i = 0; i < 40; ++i)
         ASSERT_EQ(AddUser({.name = "user" + std::to_string(i), .password = "x", .mail = "m"}), 0);
     const auto files = AllFiles();
+    const int listed = TAVOUserTotalNum(TAVO_USER_LOCAL);
     const std::string outside = "/var/outside";
     test::WriteFile(outside, "precious\n", 0600);
     std::mt19937 random(20240521);
@@ -167,14 +168,14 @@ TEST(UserStore, DamageOfEveryKind)
         damages[kind](store);
         if (round % 3 == 0) {
             ASSERT_TRUE(GetUser("USER17")) << kind << " " << store << " " << std::hex << TLIBErrGet();
-            ASSERT_EQ(TAVOUserTotalNum(TAVO_USER_LOCAL), 42) << kind << " " << store;
+            ASSERT_EQ(TAVOUserTotalNum(TAVO_USER_LOCAL), listed) << kind << " " << store;
         } else if (round % 3 == 1) {
             ASSERT_EQ(AddUser({.name = "new"}), 0) << kind << " " << store;
             ASSERT_EQ(test::DeleteUser("new"), 0);
             ASSERT_EQ(test::Lines(test::FileText("/etc/passwd")).size(), test::Lines(files[0]).size())
                 << kind << " " << store;
         } else {
-            ASSERT_EQ(GetUser("user3")->nUid, 1030) << kind << " " << store;
+            ASSERT_STREQ(GetUser("user3")->szMail, "m") << kind << " " << store;
         }
         struct stat st;
         ASSERT_TRUE(::lstat(store, &st) == 0 && S_ISREG(st.st_mode) && st.st_uid == 0) << kind;
