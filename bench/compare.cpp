@@ -8,7 +8,7 @@
 
 namespace bench {
 
-void Compare(const std::string &work, int size, const std::vector<Contender> &contenders)
+void Compare(const std::string &work, int size, const std::vector<Contender> &contenders, Clock clock)
 {
     const uint64_t expected = contenders.front().work();
     for (const Contender &contender : contenders) {
@@ -22,10 +22,12 @@ void Compare(const std::string &work, int size, const std::vector<Contender> &co
     }
     for (const Contender &contender : contenders) {
         const std::string name = work + "/" + std::to_string(size) + "/" + contender.name;
-        benchmark::RegisterBenchmark(name.c_str(), [contender](benchmark::State &state) {
+        auto *measured = benchmark::RegisterBenchmark(name.c_str(), [contender](benchmark::State &state) {
             for (auto _ : state)
                 benchmark::DoNotOptimize(contender.work());
         });
+        if (clock == Clock::kElapsed)
+            measured->UseRealTime();
     }
 }
 

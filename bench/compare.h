@@ -20,8 +20,13 @@ struct Contender {
     std::function<uint64_t()> work;  // gives a number that depends on its result
 };
 
+// What a piece of work is measured by: the time that passes, or the time of this processor alone, which other load on
+// the machine disturbs less. The second is for work that neither waits nor starts children.
+enum class Clock { kElapsed, kProcessor };
+
 // Ends the program when the contenders do not all give the same number. The first is what the others are compared to.
-void Compare(const std::string &work, int size, const std::vector<Contender> &contenders);
+void Compare(const std::string &work, int size, const std::vector<Contender> &contenders,
+             Clock clock = Clock::kElapsed);
 
 // Measures what has been compared; for main.
 int Run(int argc, char **argv);

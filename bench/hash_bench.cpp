@@ -100,9 +100,11 @@ void CompareBuild(const std::string &work, const Texts &keys, const Texts &value
                      [=] {
                          return static_cast<uint64_t>(BuildMap<StdMap>(keys, values).size());
                      }},
-                    {"flat_hash_map", [=] {
+                    {"flat_hash_map",
+                     [=] {
                          return static_cast<uint64_t>(BuildMap<AbslMap>(keys, values).size());
-                     }}});
+                     }}},
+                   bench::Clock::kProcessor);
 }
 
 // Adds up the first two bytes of what is found; 1 for what is not.
@@ -156,9 +158,11 @@ void CompareFind(const std::string &work, const Texts &keys, const Texts &values
                      [=] {
                          return FindAll<std::string_view>(*std_map, wanted);
                      }},
-                    {"flat_hash_map", [=] {
+                    {"flat_hash_map",
+                     [=] {
                          return FindAll<absl::string_view>(*absl_map, wanted);
-                     }}});
+                     }}},
+                   bench::Clock::kProcessor);
 }
 
 }  // namespace

@@ -99,6 +99,33 @@ bool Holds(const TLIBSZHASHSLOT &slot, std::string_view key, const char *end)
     return SameBytes(slot.pszKey, key.data(), bytes);
 }
 
+char *StoreText(TLIBSZHASH *hash, std::string_view text)
+{
+    char *stored = hash->pszNextStr;
+    std::memmove(stored, text.data(), text.size());
+    stored[text.size()] = '\0';
+    hash->pszNextStr += text.size() + 1;
+    hash->nStrFree -= static_cast<int32_t>(text.size() + 1);
+    return stored;
+}
+
+void StoreNewPair(TLIBSZHASH *hash, int slot, std::string_view key, std::string_view value)
+{
+    hash->slots[slot].pszKey = StoreText(hash, key);
+    hash->slots[slot].pszValue = StoreText(hash, value);
+    ++hash->nPair;
+}
+
+// Less than a quarter of the slots is free. The ratio is one of single-precision numbers, which only a table beyond their
+// 24 bits tells from the exact one; a division for every pair would be felt.
+bool IsCrowded(const TLIBSZHASH *hash)
+{
+    const int free_slots = hash->nSlot - hash->nPair;
+    if (hash->nSlot < 1 << 24)
+        return 4 * free_slots < hash->nSlot;
+    return static_cast<float>(free_slots) / static_cast<float>(hash->nSlot) < 0.25F;
+}
+
 // The place of a key that the hash does not hold, in a table without removed pairs.
 int FirstFreeSlot(const TLIBSZHASH *hash, std::string_view key)
 {
@@ -110,16 +137,6 @@ int FirstFreeSlot(const TLIBSZHASH *hash, std::string_view key)
             return -1;
     }
     return slot;
-}
-
-char *StoreText(TLIBSZHASH *hash, std::string_view text)
-{
-    char *stored = hash->pszNextStr;
-    std::memmove(stored, text.data(), text.size());
-    stored[text.size()] = '\0';
-    hash->pszNextStr += text.size() + 1;
-    hash->nStrFree -= static_cast<int32_t>(text.size() + 1);
-    return stored;
 }
 
 }  // namespace
@@ -215,8 +232,9 @@ TLIBSZHASH *CopyToNewHash(const TLIBSZHASH *hash, int64_t slots, int64_t string_
         const std::string_view value(hash->slots[slot].pszValue);
         // The keys differ from each other and nothing has been removed yet, so no key needs comparing.
         const int free_slot = FirstFreeSlot(copy.Get(), key);
-        if (free_slot < 0 || PairBytes(key, value) > copy->nStrFree || !StorePair(copy.Get(), free_slot, key, value))
+        if (free_slot < 0 || PairBytes(key, value) > copy->nStrFree)
             return nullptr;
+        StoreNewPair(copy.Get(), free_slot, key, value);
     }
     return copy.Release();
 }
@@ -225,8 +243,7 @@ bool MakeHashRoom(TLIBSZHASH **hash, int64_t bytes, HashOwner &left) noexcept
 {
     const TLIBSZHASH *old = *hash;
     const int free_slots = old->nSlot - old->nPair;
-    const float free_ratio = static_cast<float>(free_slots) / static_cast<float>(old->nSlot);
-    const int64_t slots = free_ratio < 0.25F ? int64_t{4} * old->nSlot - 5 : old->nSlot;
+    const int64_t slots = IsCrowded(old) ? int64_t{4} * old->nSlot - 5 : old->nSlot;
     int64_t string_bytes = old->nStrSize;
     if (old->nStrFree <= bytes) {
         const int64_t average = old->nPair > 0 ? old->nStrSize / old->nPair : bytes;
@@ -253,9 +270,7 @@ bool StorePair(TLIBSZHASH *hash, int slot, std::string_view key, std::string_vie
         std::memcpy(kept.get(), value.data(), value.size() + 1);
         value = {kept.get(), value.size()};
     }
-    hash->slots[slot].pszKey = StoreText(hash, key);
-    hash->slots[slot].pszValue = StoreText(hash, value);
-    ++hash->nPair;
+    StoreNewPair(hash, slot, key, value);
     return true;
 }
 

@@ -23,7 +23,11 @@ class ContainerOwner {
             Reset(other.Release());
         return *this;
     }
-    ~ContainerOwner() { Reset(); }
+    ~ContainerOwner()
+    {
+        if (container_)
+            Reset();
+    }
 
     explicit operator bool() const noexcept { return container_ != nullptr; }
     Container *Get() const noexcept { return container_; }
