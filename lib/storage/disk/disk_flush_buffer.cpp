@@ -19,7 +19,7 @@ extern "C" int TAVOIDiskFlushBuffer(const char *szPath)
             return Fail(code);
         const int fd = disk.Descriptor();
         ::sync();
-        const bool written = (::fsync(fd) == 0) & (::fdatasync(fd) == 0);
+        const int failures = ::fsync(fd) | ::fdatasync(fd);
         ::sync();
         if (::ioctl(fd, BLKFLSBUF, nullptr) != 0) {
             LogError("%s:%d ioctl(fd, BLKFLSBUF, NULL) fail");
@@ -28,6 +28,6 @@ extern "C" int TAVOIDiskFlushBuffer(const char *szPath)
         ::sync();
         const int result = disk.Command(DISK_COMMAND_FLUSH, nullptr);
         ::sync();
-        return written ? result : -1;
+        return failures ? -1 : result;
     });
 }
