@@ -67,6 +67,13 @@ TAVO_API int TLIBScemdNotify(int signal);
  * TLIBScemdNotify. */
 TAVO_API int TAVOSchedulerHup(int signal);
 
+/* --- services --- */
+
+/* Stops (1), starts (2), restarts (3) or reloads (4) the network-backup server, /usr/bin/rsync with
+ * /usr/tavo/etc/rsyncd.conf, known by /var/run/rsyncd.pid. One that does not run is stopped; one that runs is started.
+ * Returns 0, or -1 with ERR_BAD_PARAMETERS (another operation) or ERR_OP_FAILURE. */
+TAVO_API int TAVONetBkpService(int operation);
+
 TAVO_END_DECLS
 
 #endif

@@ -20,6 +20,7 @@
 #include "tavo_quota.h"
 #include "tavo_raid.h"
 #include "tavo_section.h"
+#include "tavo_service.h"
 #include "tavo_str.h"
 #include "tavo_user.h"
 

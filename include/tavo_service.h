@@ -1,0 +1,297 @@
+/*
+ * Services: the table of the appliance's services, their state, and how they are switched.
+ *
+ * The tables are compiled in and constant. All state lives elsewhere: the enable keys in /etc/tavoinfo.conf, the
+ * capabilities of the model in /etc.defaults/tavoinfo.conf, the data folders behind the links under /var/services, and
+ * the daemons themselves, which the scripts under /usr/tavo/etc/rc.d/ start and stop.
+ */
+#ifndef TAVO_SERVICE_H
+#define TAVO_SERVICE_H
+
+#include "tavo_error.h"
+#include "tavo_list.h"
+
+TAVO_BEGIN_DECLS
+
+typedef struct TAVOSERVICE TAVOSERVICE;
+
+/* Switches a service; action is one of the codes below. Returns 0 or -1 with a code. */
+typedef int (*TAVOSERVICEACTION)(const TAVOSERVICE *pService, int action);
+
+/* Returns 1 when the service is enabled and running, else 0. */
+typedef int (*TAVOSERVICESTATUS)(const TAVOSERVICE *pService);
+
+/* One service. Texts are NULL where the service has none. The rows belong to the library. */
+struct TAVOSERVICE {
+    const char *szName;         /* unique; compared with the case of its letters */
+    const char *szScript;       /* start-up script: takes "start", "stop" or "restart" */
+    const char *szKey;          /* enable key in /etc/tavoinfo.conf: "yes" or "no" */
+    const char *szProc;         /* a pid file when it holds a "/", else the name of a process */
+    TAVOSERVICEACTION pfAction; /* NULL: driven by its daemon mask alone */
+    TAVOSERVICESTATUS pfStatus;
+    uint32_t fDaemon;     /* bits that TAVONetService understands; 0: none */
+    int32_t rgShareId[4]; /* its data folders, in the order in which they are bound; ended by 12 */
+};
+
+/* What rgShareId ends with. */
+#define TAVO_SERVICE_SHARE_END 12
+
+/* The data folder of a service: a row of the share table, filled in by TAVOServiceSettingGet. */
+typedef struct TAVOSERVICESHARE {
+    int32_t nId;           /* 1 to 11 */
+    int32_t fOnVolume;     /* 1: the link leads to an existing folder */
+    char szShare[52];      /* stem of the share's name */
+    char szLink[52];       /* the symbolic link under /var/services */
+    char szEnableKey[52];  /* key in /etc/tavoinfo.conf; "" for none */
+    char szVolume[52];     /* the link's target */
+    char szVolumePath[52]; /* the directory that holds the target */
+    char szShareName[128]; /* the stem as nNaming has it */
+    int32_t fSupported;    /* 1: the model has this service */
+    int32_t nNaming;       /* 0 "@%s" (hidden), 1 "%s", 2 "@database/%s" */
+    int32_t nAttributeA;   /* constants of the row */
+    int32_t nAttributeB;
+    int32_t nReserved;      /* 0 */
+    int32_t fSpecialVolume; /* 1: on an external or a remote volume */
+} TAVOSERVICESHARE;
+
+/* Actions of TAVOServiceActionSet and of the action handlers. */
+enum {
+    TAVO_SERVICE_ENABLE = 0,  /* set the key to "yes", bind the data folders, start */
+    TAVO_SERVICE_DISABLE = 1, /* set the key to "no", stop, release the data folders */
+    TAVO_SERVICE_STOP = 2,
+    TAVO_SERVICE_START = 3,
+    TAVO_SERVICE_RESTART = 4,
+    TAVO_SERVICE_KEY_NO = 5, /* the key alone */
+    TAVO_SERVICE_KEY_YES = 6
+};
+
+/* Operations of TAVONetService. */
+enum { TAVO_DAEMON_STOP = 1, TAVO_DAEMON_START = 2, TAVO_DAEMON_RESTART = 3, TAVO_DAEMON_RELOAD = 4 };
+
+/* Daemons of TAVONetService, one bit each. */
+#define TAVO_DAEMON_AFP          0x00000001u
+#define TAVO_DAEMON_MEDIA        0x00000002u
+#define TAVO_DAEMON_SMB          0x00000004u
+#define TAVO_DAEMON_CRON         0x00000008u
+#define TAVO_DAEMON_FTP          0x00000010u
+#define TAVO_DAEMON_DATABASE     0x00000020u /* the stack of database servers and of what builds on them */
+#define TAVO_DAEMON_WEB_USER     0x00000040u
+#define TAVO_DAEMON_THUMBNAIL    0x00000080u
+#define TAVO_DAEMON_NETBKP       0x00000100u
+#define TAVO_DAEMON_DOWNLOAD     0x00000200u
+#define TAVO_DAEMON_PRINTER      0x00000400u
+#define TAVO_DAEMON_PLAYER       0x00000800u /* media sharing for players */
+#define TAVO_DAEMON_INDEX        0x00001000u
+#define TAVO_DAEMON_SURVEILLANCE 0x00002000u
+#define TAVO_DAEMON_VIDEO        0x00004000u /* video conversion */
+#define TAVO_DAEMON_NFS          0x00008000u
+#define TAVO_DAEMON_RESTORE      0x00010000u
+#define TAVO_DAEMON_MDNS         0x00020000u
+#define TAVO_DAEMON_REMOTE       0x00040000u /* remote control */
+#define TAVO_DAEMON_LOG          0x00080000u
+#define TAVO_DAEMON_ISCSI        0x00100000u
+#define TAVO_DAEMON_AUDIO        0x00200000u
+#define TAVO_DAEMON_WEBDAV       0x00400000u
+#define TAVO_DAEMON_WEB_SYSTEM   0x80000000u
+
+/*
+ * Look-ups. They read the tables alone; a bad id gives NULL or -1 with ERR_BAD_PARAMETERS. Rows and texts belong to the
+ * library and are never freed.
+ */
+
+/* The row of a service, id 0 to 30; row 30 is the empty one that ends the table. */
+TAVO_API const TAVOSERVICE *TAVOServiceInfoGet(int id);
+
+/* The id of the service with exactly this name; -1 when there is none (no code) or the name is NULL
+ * (ERR_BAD_PARAMETERS). */
+TAVO_API int TAVOServiceIndexGet(const char *szName);
+
+/* One text of a row; NULL without a code when the service has none. */
+TAVO_API const char *TAVOServiceNameGet(int id);
+TAVO_API const char *TAVOServiceScriptGet(int id);
+TAVO_API const char *TAVOServiceKeyGet(int id);
+TAVO_API const char *TAVOServiceProcGet(int id);
+
+/* The daemon mask of a service; -1 for a bad id. */
+TAVO_API int TAVOServiceDaemonIDGet(int id);
+
+/* The data folders of a service, ended by TAVO_SERVICE_SHARE_END. */
+TAVO_API const int32_t *TAVOServiceShareIDGet(int id);
+
+/* How a service is driven: 0 bound to data folders (and always the printer, id 9), 1 by its script, 2 by its key alone,
+ * 3 by its daemon mask alone, -1 by none of these, or a bad id. */
+TAVO_API int TAVOServiceTypeGet(int id);
+
+/* The daemons that serve a kind of data folder, by its name without regard to case: "web", "NetBackup",
+ * "surveillance", "photo", "video", "music"; 0 for any other name, -1 with ERR_BAD_PARAMETERS for NULL or "". */
+TAVO_API int TAVOServiceDaemonGet(const char *szName);
+
+/*
+ * State.
+ */
+
+/* Fills *pShare for data folder idShare, 1 to 11: the constant row, the share's name, the capability of the model (keys
+ * of /etc.defaults/tavoinfo.conf), and where the link under /var/services leads. Clears the error state when the link
+ * leads anywhere.
+ * Returns 1 when the folder exists on a volume, 0 when not, -1 with *pShare filled in as far as it is known and
+ *   ERR_BAD_PARAMETERS  bad id or NULL; *pShare untouched
+ *   ERR_UNKNOWN         the link cannot be read, or its target is longer than 51 bytes */
+TAVO_API int TAVOServiceSettingGet(int idShare, TAVOSERVICESHARE *pShare);
+
+/* Follows the link szLink: its target goes to szVolume (cbVolume bytes) and the directory that holds the target to
+ * szPath (cbPath bytes); for a target with "database" in it, the directory above that one.
+ * Returns 1 when the target is a folder, 0 when not or when there is no link (both buffers empty), -1 with
+ *   ERR_BAD_PARAMETERS  a NULL or empty argument, or a size below 1
+ *   ERR_UNKNOWN         not a link, not readable, or a target that does not fit */
+TAVO_API int TAVOServiceVolumeGetbyLink(const char *szLink, char *szVolume, int cbVolume, char *szPath, int cbPath);
+
+/* 1 when the enable key of data folder idShare is "yes" in /etc/tavoinfo.conf, in any case of letters; else 0. For the
+ * download scheduler (4) the answer stands in its own settings, /usr/tavo/etc/download.conf. ERR_BAD_PARAMETERS: bad id. */
+TAVO_API int TAVOServiceEnableGet(int idShare);
+
+/* 1 when service id is enabled, bound and running, as its status handler has it; else 0. ERR_BAD_PARAMETERS: bad id, or
+ * the empty row. */
+TAVO_API int TAVOServiceStatusGet(int id);
+
+/* Pushes the names of the services that the model supports onto *ppNames, which may move; of a service without data
+ * folders every one counts. Returns the number pushed, or -1 with ERR_BAD_PARAMETERS (NULL) or ERR_OUT_OF_MEMORY. */
+TAVO_API int TAVOServiceGetAll(TLIBSZLIST **ppNames);
+
+/* The same for the services that have a data folder on volume szVolume ("/volume1"). */
+TAVO_API int TAVOServiceGetbyVolume(const char *szVolume, TLIBSZLIST **ppNames);
+
+/* The volume ("/volume1") on which the share szShare lies, as recorded in /usr/tavo/etc/share.conf.
+ * Returns the length with its NUL, 0 with ERR_NO_SUCH_SHARE, -1 with ERR_BAD_PARAMETERS or ERR_NOT_ENOUGH_MEMORY. */
+TAVO_API int TAVOServiceVolumeGetbyShare(const char *szShare, char *szVolume, int cbVolume);
+
+/* 1 when the link of data folder idShare leads to a folder on volume szVolume, 0 when not, -1 with ERR_BAD_PARAMETERS
+ * or what TAVOServiceSettingGet reports. */
+TAVO_API int TAVOServiceIsOnVolume(int idShare, const char *szVolume);
+
+/* Looks on every mounted volume for an existing folder of data folder idShare; the first one's path goes to szVolume
+ * ("/volume2"). Returns the number of that volume, 0 when there is none, -1 with ERR_BAD_PARAMETERS. */
+TAVO_API int TAVOServiceDataSearch(int idShare, char *szVolume, int cbVolume);
+
+/*
+ * Control.
+ */
+
+/* Switches service id; the one entry point that programs use. action is TAVO_SERVICE_ENABLE to TAVO_SERVICE_KEY_YES.
+ * Returns 0, or -1 with what was done until then in place and
+ *   ERR_BAD_PARAMETERS      bad id or action, or an action that a service without a key does not have
+ *   ERR_SERVICE_ACTION      the service has no way to be switched
+ *   ERR_SERVICE_STD_ACTION  its script or its daemons failed
+ *   or a code of what the service's handler calls */
+TAVO_API int TAVOServiceActionSet(int id, int action);
+
+/* The standard handlers: of the action (see TAVOServiceActionSet), and of the status. A service counts as enabled unless
+ * its key is "no"; the status holds the settings lock (0x805, at most 5 s) for the look at the key. */
+TAVO_API int TAVOServiceSTDAction(const TAVOSERVICE *pService, int action);
+TAVO_API int TAVOServiceSTDStatus(const TAVOSERVICE *pService);
+
+/* The handlers of single services; what they do beyond the standard ones is said in their sources. */
+TAVO_API int TAVOServiceAFP(const TAVOSERVICE *pService, int action);
+TAVO_API int TAVOServiceAudio(const TAVOSERVICE *pService, int action);
+TAVO_API int TAVOServiceHTTPS(const TAVOSERVICE *pService, int action);
+TAVO_API int TAVOServiceNetBkp(const TAVOSERVICE *pService, int action);
+TAVO_API int TAVOServiceSAMBA(const TAVOSERVICE *pService, int action);
+TAVO_API int TAVOServiceSSH(const TAVOSERVICE *pService, int action);
+TAVO_API int TAVOServiceTelnet(const TAVOSERVICE *pService, int action);
+TAVO_API int TAVOServiceUserHome(const TAVOSERVICE *pService, int action);
+TAVO_API int TAVOServiceiTunes(const TAVOSERVICE *pService, int action);
+TAVO_API int TAVOServiceAFPStatus(const TAVOSERVICE *pService);
+TAVO_API int TAVOServiceFTPStatus(const TAVOSERVICE *pService);
+TAVO_API int TAVOServicePrinterStatus(const TAVOSERVICE *pService);
+TAVO_API int TAVOServiceSSHStatus(const TAVOSERVICE *pService);
+TAVO_API int TAVOServiceTelnetStatus(const TAVOSERVICE *pService);
+TAVO_API int TAVOServiceiTunesStatus(const TAVOSERVICE *pService);
+
+/* Stops, starts, restarts or reloads the daemons of fDaemon (TAVO_DAEMON_*) in a fixed order, under the locks of the
+ * settings file, of Samba and of the Apple services (0x1846, at most 5 s), which are held until the last script has
+ * ended: a start script must not call a function that takes one of them, or it waits for its own time-out and fails.
+ * With both web servers the user's is stopped, the system's restarted and the user's started again.
+ * Returns the bits whose commands succeeded (0x40000000 stands for the system web server), 0 when none did, or -1 with
+ *   ERR_BAD_PARAMETERS  no daemon or no such operation
+ *   ERR_LOCK_FAILED     another process is switching services, or changing one of those files */
+TAVO_API int TAVONetService(uint32_t fDaemon, int operation);
+
+/* Sets the enable key of data folder idShare to "no" and nothing else. Returns 0 or -1. */
+TAVO_API int TAVOServiceDisableSet(int idShare);
+
+/* Stops (fOn 0) or starts (fOn 1) every enabled service, the last ones first when stopping; keys stay. Failures are
+ * logged and passed over. Returns the number of services that were switched. */
+TAVO_API int TAVOServiceOnOffALL(int fOn);
+
+/* Runs the start-up scripts of installed packages (/usr/tavo/etc/rc.d/packages, in the order of their names, backwards
+ * for "stop") with the argument "start", "stop" or "restart". Returns the number of scripts that succeeded, or -1 with
+ * ERR_BAD_PARAMETERS. */
+TAVO_API int TAVOServiceThirdPartyAll(const char *szAction);
+
+/*
+ * Data folders. A folder is bound when its share is recorded in /usr/tavo/etc/share.conf, under the lock of the shares,
+ * and its link under /var/services leads to it. fDelete 0 keeps the data of a folder that is released; 1 deletes it.
+ */
+
+/* Chooses the volume of data folder idShare: the one that its link names when that is still there, else the mounted and
+ * writable one with the most free space. Its path goes to szVolume. Returns its number, 0 with ERR_NO_SERVICE_VOLUME,
+ * -1 with ERR_BAD_PARAMETERS. */
+TAVO_API int TAVOServiceNewVolumeDecide(int idShare, char *szVolume, int cbVolume);
+
+/* Binds data folder idShare to volume szVolume: creates the share, then sets the link. Returns 0 or -1; a share that
+ * was created stays when the link fails. */
+TAVO_API int TAVOServiceSet(int idShare, const char *szVolume);
+
+/* The path of data folder idShare on volume szVolume goes to szPath. Returns its length with the NUL, or -1 with
+ * ERR_BAD_PARAMETERS or ERR_NOT_ENOUGH_MEMORY. */
+TAVO_API int TAVOServiceShareGen(int idShare, const char *szVolume, char *szPath, int cbPath);
+
+/* Creates the folder (and its parents below the volume) and records the share; an existing folder is taken as it is.
+ * Returns 0, or -1 with ERR_BAD_PARAMETERS, ERR_MKDIR_FAILED, ERR_NOT_ENOUGH_SPACE or a code of the settings files. */
+TAVO_API int TAVOServiceShareCreate(int idShare, const char *szVolume);
+
+/* Records a new volume for a share that exists; nothing is moved. Returns 0, or -1 (ERR_NO_SUCH_SHARE, ...). */
+TAVO_API int TAVOServiceShareUpdate(int idShare, const char *szVolume);
+
+/* Forgets the share and, with fDelete 1, deletes its folder; links in it are deleted, never followed. A share that is
+ * not recorded is no failure. Returns 0, or -1 with ERR_REMOVE_FAILED or a code of the settings files. */
+TAVO_API int TAVOServiceShareRemove(int idShare, int fDelete);
+
+/* 1 when the folder behind the link is empty, 0 when not, -1 with ERR_BAD_PARAMETERS, or ERR_MAKE_PATH when it cannot be
+ * read. */
+TAVO_API int TAVOServiceShareIsEmpty(int idShare);
+
+/* Points the link of data folder idShare at szTarget; the link is replaced, what is no link stays.
+ * Returns 0, or -1 with
+ *   ERR_BAD_PARAMETERS    bad id, or szTarget is NULL or empty
+ *   ERR_NOT_ENOUGH_SPACE  no room for /var/services
+ *   ERR_MKDIR_FAILED      /var/services or the link could not be created */
+TAVO_API int TAVOServiceLinkSet(int idShare, const char *szTarget);
+
+/* Removes the link; one that is not there is no failure. Returns 0, or -1 with ERR_BAD_PARAMETERS, or ERR_REMOVE_FAILED
+ * when what stands there is no link. */
+TAVO_API int TAVOServiceLinkRemove(int idShare);
+
+/* Releases data folders: the link, then the share. Of one folder, of a service (by row or by id), of every service that
+ * has a folder on a volume, or of all. A folder that another enabled service uses is kept. Return 0, or -1 with
+ * ERR_SERVICE_REMOVE after the rest has been released all the same. */
+TAVO_API int TAVOServiceRemove(int idShare, int fDelete);
+TAVO_API int TAVOServiceRemovebyInfo(const TAVOSERVICE *pService, int fDelete);
+TAVO_API int TAVOServiceRemovebyID(int id, int fDelete);
+TAVO_API int TAVOServiceRemovebyVolume(const char *szVolume, int fDelete);
+TAVO_API int TAVOServiceRemoveAll(int fDelete);
+
+/* Binds data folder idShare to another volume and restarts the services that use it and are enabled; data is not moved.
+ * Returns 0 or -1. */
+TAVO_API int TAVOServiceVolumeChange(int idShare, const char *szVolume);
+
+/* After volume szVolume came back: sets the links of the data folders that stand on it and whose services are enabled,
+ * and starts those services. Returns the number of folders that were bound again, or -1 with ERR_BAD_PARAMETERS. */
+TAVO_API int TAVOServiceRestore(const char *szVolume);
+
+/* After a volume appeared where there had been none: enables the data folders of every enabled service whose link leads
+ * nowhere, and restarts it. Returns the number of services that were restarted. */
+TAVO_API int TAVOServiceRestartfromVolumeNone(void);
+
+TAVO_END_DECLS
+
+#endif

@@ -1,0 +1,68 @@
+// The record of shared folders, /usr/tavo/etc/share.conf: one section a share, with its path.
+#include "service/detail/share_file.h"
+
+#include "tavo_file.h"
+#include "tavo_hash.h"
+#include "tavo_section.h"
+
+#include "core/detail/list_owner.h"
+#include "core/detail/lock_hold.h"
+
+namespace tavo {
+namespace {
+
+constexpr const char *kShares = "/usr/tavo/etc/share.conf";
+constexpr unsigned kSharesLock = 0x40 | 6;  // that of Samba, whose configuration the shares become
+constexpr int kLockSeconds = 5;
+constexpr int kHashBytes = 512;
+
+int ReadShare(const char *name, HashOwner &share)
+{
+    share.Reset(PshTLIBSzHashAlloc(kHashBytes));
+    if (!share)
+        return ERR_OUT_OF_MEMORY;
+    return TLIBFileGetSection(kShares, name, share.Addr()) < 0 ? TLIBErrGet() : 0;
+}
+
+}  // namespace
+
+int SharePath(const char *name, std::string &path)
+{
+    HashOwner share;
+    if (const int code = ReadShare(name, share))
+        return code;
+    const char *value = SzTLIBSzHashGetValue(share.Get(), "path");
+    path = value ? value : "";
+    return 0;
+}
+
+int RecordShare(const char *name, const std::string &path)
+{
+    const LockHold lock(kSharesLock, kLockSeconds);
+    HashOwner share;
+    if (!lock)
+        return TLIBErrGet();
+    if (TLIBFileTouch(kShares) != 0)
+        return TLIBErrGet();
+    if (const int code = ReadShare(name, share))
+        return code;
+    if (TLIBSzHashSetValue(share.Addr(), "path", path.c_str()) < 0)
+        return ERR_OUT_OF_MEMORY;
+    const int found = ErrTLIBFileSetSection(kShares, name, nullptr, share.Get(), 1, nullptr);
+    if (found < 0 || (found == 0 && ErrTLIBFileAddSection(kShares, name, share.Get(), nullptr) < 0))
+        return TLIBErrGet();
+    return 0;
+}
+
+int ForgetShare(const char *name)
+{
+    const LockHold lock(kSharesLock, kLockSeconds);
+    std::string path;
+    if (!lock)
+        return TLIBErrGet();
+    if (SharePath(name, path) != 0 || path.empty())
+        return 0;
+    return ErrTLIBFileRemoveSection(kShares, name) < 0 ? TLIBErrGet() : 0;
+}
+
+}  // namespace tavo

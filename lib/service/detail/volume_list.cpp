@@ -1,0 +1,112 @@
+// The appliance's volumes: file systems mounted at /volume1, /volume2, ...
+#include "service/detail/volume_list.h"
+
+#include "core/detail/open_file.h"
+#include "core/detail/text_fields.h"
+
+#include <algorithm>
+#include <charconv>
+
+#include <climits>
+
+namespace tavo {
+namespace {
+
+constexpr std::string_view kStem = "/volume";
+
+bool OneOf(std::string_view text, std::initializer_list<std::string_view> words)
+{
+    return std::find(words.begin(), words.end(), text) != words.end();
+}
+
+bool IsReadWrite(std::string_view options)
+{
+    return options == "rw" || options.starts_with("rw,");
+}
+
+std::string ReadWhole(const char *path)
+{
+    std::string text;
+    const Fd fd = OpenFd(path, O_RDONLY);
+    char block[4096];
+    for (ssize_t got; fd && (got = ::read(fd.Get(), block, sizeof block)) > 0;)
+        text.append(block, static_cast<size_t>(got));
+    return text;
+}
+
+// The kernel's own path of the disk names the bus that it hangs on.
+bool IsBehindUsb(std::string_view device)
+{
+    constexpr std::string_view dev = "/dev/";
+    if (!device.starts_with(dev))
+        return false;
+    std::string disk(device.substr(dev.size()));
+    disk.erase(disk.find_last_not_of("0123456789") + 1);
+    char target[PATH_MAX];
+    const ssize_t length = ::readlink(("/sys/block/" + disk).c_str(), target, sizeof target);
+    return length > 0 && std::string_view(target, static_cast<size_t>(length)).find("/usb") != std::string_view::npos;
+}
+
+}  // namespace
+
+int VolumeNumber(std::string_view path) noexcept
+{
+    int number = 0;
+    if (!path.starts_with(kStem))
+        return 0;
+    const char *const end = path.data() + path.size();
+    const auto [next, error] = std::from_chars(path.data() + kStem.size(), end, number);
+    return error == std::errc() && next == end && number > 0 && path[kStem.size()] != '0' ? number : 0;
+}
+
+std::string_view VolumeOf(std::string_view path) noexcept
+{
+    const std::string_view volume = path.substr(0, path.find('/', 1));
+    return VolumeNumber(volume) ? volume : std::string_view();
+}
+
+std::vector<Volume> ParseVolumes(std::string_view mounts)
+{
+    std::vector<Volume> volumes;
+    while (!mounts.empty()) {
+        const auto field = SplitFields(TakeLine(mounts));
+        const int number = field.size() >= 4 ? VolumeNumber(field[1]) : 0;
+        if (number == 0)
+            continue;
+        std::erase_if(volumes, [&](const Volume &volume) { return volume.number == number; });
+        volumes.push_back(
+            {number, std::string(field[1]), std::string(field[0]), std::string(field[2]), IsReadWrite(field[3])});
+    }
+    std::sort(volumes.begin(), volumes.end(),
+              [](const Volume &left, const Volume &right) { return left.number < right.number; });
+    return volumes;
+}
+
+std::vector<Volume> MountedVolumes()
+{
+    return ParseVolumes(ReadWhole("/proc/mounts"));
+}
+
+VolumeKind KindOf(const Volume &volume)
+{
+    const std::string_view source = volume.source;
+    if (OneOf(volume.file_system, {"nfs", "nfs4", "cifs", "smb3", "smbfs", "fuse.sshfs"}) || source.starts_with("//") ||
+        source.find(":/") != std::string_view::npos)
+        return kVolumeRemote;
+    if (OneOf(volume.file_system, {"vfat", "msdos", "exfat", "ntfs", "ntfs3", "fuseblk", "hfs", "hfsplus"}) ||
+        IsBehindUsb(source))
+        return kVolumeExternal;
+    return kVolumeInternal;
+}
+
+int VolumeType(std::string_view path)
+{
+    const std::string_view wanted = VolumeOf(path);
+    for (const Volume &volume : MountedVolumes()) {
+        if (volume.path == wanted)
+            return KindOf(volume);
+    }
+    return -1;
+}
+
+}  // namespace tavo

@@ -1,0 +1,40 @@
+// The appliance's volumes: file systems mounted at /volume1, /volume2, ...
+#ifndef TAVO_SERVICE_DETAIL_VOLUME_LIST_H
+#define TAVO_SERVICE_DETAIL_VOLUME_LIST_H
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace tavo {
+
+enum VolumeKind : int { kVolumeInternal = 1, kVolumeExternal = 4, kVolumeRemote = 8 };
+
+struct Volume {
+    int number = 0;
+    std::string path;  // "/volume1"
+    std::string source;
+    std::string file_system;
+    bool writable = false;
+};
+
+// The volumes in the text of /proc/mounts, by number; of a path that is mounted over, the last mount counts.
+std::vector<Volume> ParseVolumes(std::string_view mounts);
+
+// The number of "/volumeN"; 0 for anything else.
+int VolumeNumber(std::string_view path) noexcept;
+
+// The "/volumeN" that a path lies on; empty when it lies elsewhere.
+std::string_view VolumeOf(std::string_view path) noexcept;
+
+std::vector<Volume> MountedVolumes();
+
+// Remote by its file system or source; external by a file system of removable disks, or a disk behind USB.
+VolumeKind KindOf(const Volume &volume);
+
+// The kind of the mounted volume that `path` lies on; -1 when there is none.
+int VolumeType(std::string_view path);
+
+}  // namespace tavo
+
+#endif

@@ -1,0 +1,12 @@
+// Switches the audio station. It plays what the index knows, so the indexing daemon follows it.
+#include "tavo_service.h"
+
+#include "service/detail/index_follows.h"
+
+extern "C" int TAVOServiceAudio(const TAVOSERVICE *pService, int action)
+{
+    const int result = TAVOServiceSTDAction(pService, action);
+    if (result == 0)
+        tavo::LetIndexFollow(action);
+    return result;
+}

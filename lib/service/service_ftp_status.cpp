@@ -1,0 +1,10 @@
+// Tells whether the FTP server is enabled and running. The row names a process and the daemon may run under inetd for a
+// single session, so the key alone does not tell and the process is asked for, too.
+#include "tavo_service.h"
+
+#include "service/detail/process_named.h"
+
+extern "C" int TAVOServiceFTPStatus(const TAVOSERVICE *pService)
+{
+    return TAVOServiceSTDStatus(pService) == 1 && tavo::IsProcessNamed("ftpd");
+}

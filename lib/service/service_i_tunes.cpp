@@ -1,0 +1,12 @@
+// Switches media sharing for players. It offers what the index knows, so the indexing daemon follows it.
+#include "tavo_service.h"
+
+#include "service/detail/index_follows.h"
+
+extern "C" int TAVOServiceiTunes(const TAVOSERVICE *pService, int action)
+{
+    const int result = TAVOServiceSTDAction(pService, action);
+    if (result == 0)
+        tavo::LetIndexFollow(action);
+    return result;
+}

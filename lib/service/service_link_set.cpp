@@ -1,0 +1,61 @@
+// Points the link of a service's data folder at its target.
+#include "tavo_service.h"
+
+#include "core/detail/log.h"
+
+#include <cerrno>
+
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace {
+
+constexpr const char *kLinkFolder = "/var/services";
+
+bool IsDirectory(const char *path)
+{
+    struct stat st;
+    return ::lstat(path, &st) == 0 && S_ISDIR(st.st_mode);
+}
+
+// Whatever else stands in the folder's place goes; the caller's umask shapes the mode, so that the folder is not open
+// to everybody where nobody asked for that.
+bool MakeLinkFolder()
+{
+    if (IsDirectory(kLinkFolder))
+        return true;
+    return (::unlink(kLinkFolder) == 0 || errno == ENOENT) && ::mkdir(kLinkFolder, 0777) == 0;
+}
+
+// Only a link is taken away: a folder or a file in its place is somebody's data.
+bool RemoveLink(const char *path)
+{
+    struct stat st;
+    if (::lstat(path, &st) != 0)
+        return errno == ENOENT;
+    return S_ISLNK(st.st_mode) && ::unlink(path) == 0;
+}
+
+}  // namespace
+
+extern "C" int TAVOServiceLinkSet(int idShare, const char *szTarget)
+{
+    TAVOSERVICESHARE share;
+
+    if (!szTarget || !*szTarget)
+        return Fail(ERR_BAD_PARAMETERS);
+    if (TAVOServiceSettingGet(idShare, &share) < 0) {
+        LogError("%s(%d)[%X] Failed to get service info : id = %d", TLIBErrGet(), idShare);
+        return -1;
+    }
+    if (!MakeLinkFolder()) {
+        const int code = errno == ENOSPC ? ERR_NOT_ENOUGH_SPACE : ERR_MKDIR_FAILED;
+        LogError("%s(%d)Failed to mkdir : %s", kLinkFolder);
+        return Fail(code);
+    }
+    if (!RemoveLink(share.szLink) || ::symlink(szTarget, share.szLink) != 0) {
+        LogError("%s(%d)Failed to create link of %s for share=%s", szTarget, share.szShare);
+        return Fail(ERR_MKDIR_FAILED);
+    }
+    return 0;
+}

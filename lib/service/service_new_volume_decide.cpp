@@ -1,0 +1,61 @@
+// Chooses the volume on which a service is to keep its data.
+#include "tavo_service.h"
+
+#include "core/detail/guard.h"
+#include "service/detail/service_table.h"
+#include "service/detail/volume_list.h"
+
+#include <cstdio>
+
+#include <sys/statvfs.h>
+
+namespace {
+
+unsigned long long FreeBytes(const tavo::Volume &volume)
+{
+    struct statvfs space;
+    if (!volume.writable || ::statvfs(volume.path.c_str(), &space) != 0)
+        return 0;
+    return static_cast<unsigned long long>(space.f_bavail) * space.f_frsize;
+}
+
+// The volume that the service's data lies on already; 0 when its folder is gone.
+int OldVolume(int idShare)
+{
+    TAVOSERVICESHARE share;
+    return TAVOServiceSettingGet(idShare, &share) == 1 ? tavo::VolumeNumber(tavo::VolumeOf(share.szVolume)) : 0;
+}
+
+int RoomiestVolume()
+{
+    int best = 0;
+    unsigned long long most = 0;
+    for (const tavo::Volume &volume : tavo::MountedVolumes()) {
+        const unsigned long long space = FreeBytes(volume);
+        if (space > most) {
+            most = space;
+            best = volume.number;
+        }
+    }
+    return best;
+}
+
+}  // namespace
+
+extern "C" int TAVOServiceNewVolumeDecide(int idShare, char *szVolume, int cbVolume)
+{
+    if (!tavo::FindServiceShare(idShare) || !szVolume || cbVolume <= 0)
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        int number = OldVolume(idShare);
+        if (number == 0)
+            number = RoomiestVolume();
+        if (number == 0)
+            return static_cast<int>(FailZero(ERR_NO_SERVICE_VOLUME));
+        const std::string path = "/volume" + std::to_string(number);
+        if (path.size() >= static_cast<size_t>(cbVolume))
+            return Fail(ERR_BAD_PARAMETERS);
+        std::snprintf(szVolume, static_cast<size_t>(cbVolume), "%s", path.c_str());
+        return number;
+    });
+}

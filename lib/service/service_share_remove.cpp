@@ -1,0 +1,33 @@
+// Forgets the share of a service and deletes its folder when the caller says so.
+#include "tavo_service.h"
+
+#include "core/detail/guard.h"
+#include "service/detail/service_table.h"
+#include "service/detail/share_file.h"
+#include "service/detail/volume_list.h"
+
+#include <filesystem>
+#include <string>
+
+extern "C" int TAVOServiceShareRemove(int idShare, int fDelete)
+{
+    TAVOSERVICESHARE share;
+
+    if (!tavo::FindServiceShare(idShare))
+        return Fail(ERR_BAD_PARAMETERS);
+    TAVOServiceSettingGet(idShare, &share);
+    return Guard([&] {
+        std::string path;
+        // A record that points outside the volumes was not made here, and nothing is deleted for it.
+        if (fDelete && tavo::SharePath(share.szShareName, path) == 0 && !tavo::VolumeOf(path).empty() &&
+            path.find("/../") == std::string::npos && path.ends_with(share.szShare)) {
+            std::error_code failed;
+            std::filesystem::remove_all(path, failed);  // deletes links, never follows them
+            if (failed)
+                return Fail(ERR_REMOVE_FAILED);
+        }
+        if (const int code = tavo::ForgetShare(share.szShareName))
+            return Fail(code);
+        return 0;
+    });
+}

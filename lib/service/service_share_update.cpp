@@ -1,0 +1,28 @@
+// Records another volume for the share of a service; what lies on the volumes stays where it is.
+#include "tavo_service.h"
+
+#include "core/detail/guard.h"
+#include "service/detail/share_file.h"
+
+#include <climits>
+#include <string>
+
+extern "C" int TAVOServiceShareUpdate(int idShare, const char *szVolume)
+{
+    char path[PATH_MAX];
+    TAVOSERVICESHARE share;
+
+    if (TAVOServiceShareGen(idShare, szVolume, path, sizeof path) < 0)
+        return -1;
+    TAVOServiceSettingGet(idShare, &share);
+    return Guard([&] {
+        std::string recorded;
+        if (const int code = tavo::SharePath(share.szShareName, recorded))
+            return Fail(code);
+        if (recorded.empty())
+            return Fail(ERR_NO_SUCH_SHARE);
+        if (const int code = tavo::RecordShare(share.szShareName, path))
+            return Fail(code);
+        return 0;
+    });
+}

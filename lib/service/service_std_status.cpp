@@ -1,0 +1,61 @@
+// Tells whether a service is enabled, has its data folders and runs: the standard handler.
+#include "tavo_service.h"
+
+#include "tavo_file.h"
+#include "tavo_lock.h"
+#include "tavo_proc.h"
+
+#include "core/detail/fault.h"
+#include "service/detail/process_named.h"
+#include "service/detail/service_table.h"
+#include "service/detail/settings_files.h"
+
+#include <cstring>
+
+namespace {
+
+constexpr unsigned kSettingsLock = 0x800;
+constexpr int kLockSeconds = 5;
+
+enum class Enabled { no, yes, unknown };
+
+// Only a "no" switches a service off: one whose key was never written runs.
+Enabled IsEnabled(const char *key)
+{
+    if (!key)
+        return Enabled::yes;
+    if (ErrTLIBFileLock(kSettingsLock | 5, kLockSeconds) != 0)
+        return Enabled::unknown;
+    const bool no = tavo::SettingIs(tavo::kSettings, key, "no");
+    if (ErrTLIBFileUnlock(kSettingsLock) != 0)
+        return Enabled::unknown;
+    return no ? Enabled::no : Enabled::yes;
+}
+
+bool IsRunning(const char *proc)
+{
+    if (!proc)
+        return true;
+    return std::strchr(proc, '/') ? TLIBProcAliveByPidFile(proc) : tavo::IsProcessNamed(proc);
+}
+
+}  // namespace
+
+extern "C" int TAVOServiceSTDStatus(const TAVOSERVICE *pService)
+{
+    if (!pService || !pService->szName)
+        return FailZero(ERR_BAD_PARAMETERS);
+    const auto shares = tavo::SharesOf(*pService);
+    if (!pService->szKey && !pService->szProc && shares.empty())
+        return 0;
+
+    const Enabled enabled = IsEnabled(pService->szKey);
+    if (enabled == Enabled::unknown)
+        return 0;
+    bool bound = true;
+    for (const int32_t id : shares) {
+        TAVOSERVICESHARE share;
+        bound = TAVOServiceSettingGet(id, &share) != 0 && bound;
+    }
+    return bound && enabled == Enabled::yes && IsRunning(pService->szProc);
+}

@@ -1,0 +1,54 @@
+// Runs the start-up scripts of installed packages.
+#include "tavo_service.h"
+
+#include "tavo_proc.h"
+
+#include "core/detail/guard.h"
+#include "core/detail/log.h"
+
+#include <algorithm>
+#include <filesystem>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include <unistd.h>
+
+namespace {
+
+constexpr const char *kPackages = "/usr/tavo/etc/rc.d/packages";
+
+std::vector<std::string> Scripts()
+{
+    std::vector<std::string> scripts;
+    std::error_code failed;
+    for (const auto &entry : std::filesystem::directory_iterator(kPackages, failed)) {
+        const std::string path = entry.path();
+        if (path.ends_with(".sh") && ::access(path.c_str(), X_OK) == 0)
+            scripts.push_back(path);
+    }
+    std::sort(scripts.begin(), scripts.end());
+    return scripts;
+}
+
+}  // namespace
+
+extern "C" int TAVOServiceThirdPartyAll(const char *szAction)
+{
+    const std::string_view action = szAction ? szAction : "";
+    if (action != "start" && action != "stop" && action != "restart")
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        std::vector<std::string> scripts = Scripts();
+        if (action == "stop")
+            std::reverse(scripts.begin(), scripts.end());
+        int done = 0;
+        for (const std::string &script : scripts) {
+            if (TLIBExec(script.c_str(), szAction, nullptr) == 0)
+                ++done;
+            else
+                LogError("%s:%d Failed to %s %s", szAction, script);
+        }
+        return done;
+    });
+}

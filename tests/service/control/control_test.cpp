@@ -1,0 +1,531 @@
+// Services switched for real: stand-in daemons start, write pid files and end; every script call is in /var/standin/rc.log.
+#include "tavo_service.h"
+
+#include "tavo_file.h"
+#include "tavo_lock.h"
+
+#include "support/captured_log.h"
+#include "support/fault_state.h"
+#include "support/scenario.h"
+#include "support/scratch_dir.h"
+
+#include <gmock/gmock.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <string>
+#include <vector>
+
+#include <sys/mount.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+using test::Fault;
+using test::LastFault;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+namespace {
+
+constexpr const char *kLog = "/var/standin/rc.log";
+
+// The calls of start-up scripts so far, "S80samba.sh start", in the order in which they began; and forgets them.
+std::vector<std::string> ScriptCalls()
+{
+    std::vector<std::string> calls;
+    std::ifstream log(kLog);
+    for (std::string line; std::getline(log, line);) {
+        if (line.find(" = ") == std::string::npos)
+            calls.push_back(line);
+    }
+    std::filesystem::remove(kLog);
+    return calls;
+}
+
+std::string Setting(const char *key)
+{
+    char value[16] = "";
+    return TLIBFileGetKeyValue("/etc/tavoinfo.conf", key, value, sizeof value, 0) > 0 ? value : "(none)";
+}
+
+std::string LinkTarget(const char *link)
+{
+    std::error_code none;
+    return std::filesystem::read_symlink(link, none);
+}
+
+class Services : public testing::Test {
+  protected:
+    void SetUp() override
+    {
+        const char *lacks = std::getenv("TAVO_ROOT_LACKS");
+        if (!lacks || std::strstr(lacks, "mount"))
+            GTEST_SKIP() << "volumes cannot be mounted here";
+        for (const char *volume : {"/volume1", "/volume2"}) {
+            ::mkdir(volume, 0755);
+            if (::mount("tmpfs", volume, "tmpfs", 0, std::strcmp(volume, "/volume1") ? "size=8m" : "size=4m") != 0)
+                GTEST_SKIP() << volume << " cannot be mounted here: " << std::strerror(errno);
+        }
+    }
+
+    void TearDown() override
+    {
+        for (const char *volume : {"/volume1", "/volume2"})
+            ::umount2(volume, MNT_DETACH);
+    }
+
+    test::CapturedLog log_;
+};
+
+TEST(ServiceLookUps, RowsAndRefusals)
+{
+    EXPECT_EQ(TAVOServiceIndexGet("DB"), 22);
+    test::ForgetFault();
+    EXPECT_EQ(TAVOServiceIndexGet("db"), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS) << "an unknown name is an answer";
+    EXPECT_EQ(TAVOServiceIndexGet(nullptr), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_interface"}));
+
+    for (const int id : {-1, 31, 1000}) {
+        test::ForgetFault();
+        EXPECT_EQ(TAVOServiceInfoGet(id), nullptr);
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_interface"})) << id;
+        EXPECT_EQ(TAVOServiceNameGet(id), nullptr);
+        EXPECT_EQ(TAVOServiceDaemonIDGet(id), -1);
+        EXPECT_EQ(TAVOServiceShareIDGet(id), nullptr);
+        EXPECT_EQ(TAVOServiceTypeGet(id), -1);
+        EXPECT_EQ(TAVOServiceActionSet(id, TAVO_SERVICE_START), -1);
+        EXPECT_EQ(TAVOServiceStatusGet(id), 0);
+    }
+
+    // The empty row that ends the table is a row: every look-up takes it.
+    test::ForgetFault();
+    ASSERT_NE(TAVOServiceInfoGet(30), nullptr);
+    EXPECT_EQ(TAVOServiceNameGet(30), nullptr);
+    EXPECT_EQ(TAVOServiceScriptGet(30), nullptr);
+    EXPECT_EQ(TAVOServiceKeyGet(30), nullptr);
+    EXPECT_EQ(TAVOServiceProcGet(30), nullptr);
+    EXPECT_EQ(TAVOServiceDaemonIDGet(30), 0);
+    EXPECT_EQ(TAVOServiceShareIDGet(30)[0], TAVO_SERVICE_SHARE_END);
+    EXPECT_EQ(TAVOServiceTypeGet(30), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+
+    const struct {
+        int id;
+        int type;
+    } types[] = {{9, 0}, {4, 0}, {12, 1}, {13, 1}, {18, 2}, {19, 2}, {21, 3}, {26, 3}};
+    for (const auto &row : types)
+        EXPECT_EQ(TAVOServiceTypeGet(row.id), row.type) << row.id;
+
+    const struct {
+        const char *name;
+        int mask;
+    } masks[] = {{"web", 0x40},
+                 {"netbackup", 0x100},
+                 {"SURVEILLANCE", 0x2000},
+                 {"photo", 0x5082},
+                 {"Video", 0x1802},
+                 {"music", 0x241802},
+                 {"homes", 0},
+                 {"", -1}};
+    for (const auto &row : masks)
+        EXPECT_EQ(TAVOServiceDaemonGet(row.name), row.mask) << row.name;
+    EXPECT_EQ(TAVOServiceDaemonGet(nullptr), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_daemon_get"}));
+}
+
+TEST(NetService, DrivesDaemonsInItsOwnOrder)
+{
+    test::CapturedLog log;
+    const uint32_t mask = TAVO_DAEMON_NFS | TAVO_DAEMON_CRON | TAVO_DAEMON_SMB | TAVO_DAEMON_AFP | TAVO_DAEMON_INDEX |
+                          TAVO_DAEMON_MDNS | TAVO_DAEMON_DOWNLOAD | TAVO_DAEMON_MEDIA;
+    EXPECT_EQ(TAVONetService(mask, TAVO_DAEMON_START), static_cast<int>(mask));
+    EXPECT_THAT(ScriptCalls(),
+                ElementsAre("S81atalk.sh start", "S80samba.sh start", "S86tavodms.sh start", "S66tavoindexd.sh start",
+                            "S25download.sh start", "S04crond.sh start", "S83nfsd.sh start", "S99mDNS.sh start"));
+    EXPECT_EQ(TAVOServiceStatusGet(21), 1) << "cron";
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_CRON, TAVO_DAEMON_STOP), static_cast<int>(TAVO_DAEMON_CRON));
+    EXPECT_EQ(TAVOServiceStatusGet(21), 0);
+    EXPECT_EQ(rgslckList[0].nRef, 0) << "no lock is left";
+
+    // One that fails is left out of the answer, the others are driven all the same.
+    test::WriteFile("/var/standin/S80samba.sh.status", "3\n");
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_SMB | TAVO_DAEMON_CRON, TAVO_DAEMON_START),
+              static_cast<int>(TAVO_DAEMON_CRON));
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_RESTORE, TAVO_DAEMON_START), 0) << "it has no command";
+}
+
+TEST(NetService, DrivesTheDatabaseStackFromTopToBottom)
+{
+    const std::vector<std::string> top_down = {"S82surveillance.sh", "S99iTunes.sh",   "S86tavodms.sh",
+                                               "S66tavoindexd.sh",   "S25download.sh", "S23tavologd.sh"};
+    const auto calls = [&](const char *word, bool upwards) {
+        std::vector<std::string> lines;
+        for (const std::string &script : top_down)
+            lines.push_back(script + " " + word);
+        if (upwards)
+            std::reverse(lines.begin(), lines.end());
+        return lines;
+    };
+    const auto join = [](std::vector<std::string> left, const std::vector<std::string> &right) {
+        left.insert(left.end(), right.begin(), right.end());
+        return left;
+    };
+    const int stack = TAVO_DAEMON_DATABASE;
+
+    EXPECT_EQ(TAVONetService(stack, TAVO_DAEMON_START), stack);
+    EXPECT_EQ(ScriptCalls(), join({"S21mysql.sh start", "S20pgsql.sh start"}, calls("start", true)));
+
+    // What the stack drives is not driven again for its own bit.
+    EXPECT_EQ(TAVONetService(stack | TAVO_DAEMON_MEDIA | TAVO_DAEMON_PLAYER | TAVO_DAEMON_INDEX | TAVO_DAEMON_DOWNLOAD |
+                                 TAVO_DAEMON_SURVEILLANCE,
+                             TAVO_DAEMON_RESTART),
+              stack);
+    EXPECT_EQ(ScriptCalls(),
+              join(join(calls("stop", false), {"S20pgsql.sh restart", "S21mysql.sh restart"}), calls("start", true)));
+
+    EXPECT_EQ(TAVONetService(stack, TAVO_DAEMON_STOP), stack);
+    EXPECT_EQ(ScriptCalls(), join(calls("stop", false), {"S20pgsql.sh stop", "S21mysql.sh stop"}));
+}
+
+TEST(NetService, RestartsTheWebServersAroundEachOther)
+{
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_WEB_SYSTEM, TAVO_DAEMON_START), 0x40000000)
+        << "the highest bit would make the result a failure";
+    EXPECT_THAT(ScriptCalls(), ElementsAre("S97apache-sys.sh start"));
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_WEB_SYSTEM | TAVO_DAEMON_WEB_USER, TAVO_DAEMON_RESTART), 0x40000040);
+    EXPECT_THAT(ScriptCalls(),
+                ElementsAre("S97apache-user.sh stop", "S97apache-sys.sh restart", "S97apache-user.sh start"));
+}
+
+TEST(NetService, ReloadsBySignal)
+{
+    ASSERT_EQ(TAVONetService(TAVO_DAEMON_WEB_USER | TAVO_DAEMON_SMB, TAVO_DAEMON_START), 0x44);
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_WEB_USER | TAVO_DAEMON_SMB, TAVO_DAEMON_RELOAD), 0x44);
+    ::usleep(100000);
+    for (const char *daemon : {"httpd-user", "smbd", "nmbd"})
+        EXPECT_THAT(test::ReadFile(std::string("/var/standin/") + daemon + ".log"), testing::HasSubstr("signal 1\n"));
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_NFS, TAVO_DAEMON_RELOAD), 0) << "there is no server to re-export for";
+}
+
+// A pid file with anything but one number in it would make the reload signal processes of others, or all of them.
+TEST(NetService, BelievesNoHostilePidFile)
+{
+    ASSERT_EQ(TAVONetService(TAVO_DAEMON_WEB_USER, TAVO_DAEMON_START), 0x40);
+    const std::string pid_file = "/var/run/httpd-user.pid";
+    const std::string mine = std::to_string(::getpid());
+    for (const std::string &text :
+         {std::string("-1\n"), mine + " 1\n", std::string("0\n"), std::string(4096, '9'), mine + "; reboot"}) {
+        test::WriteFile(pid_file, text);
+        EXPECT_EQ(TAVONetService(TAVO_DAEMON_WEB_USER, TAVO_DAEMON_RELOAD), 0) << text;
+    }
+    std::filesystem::remove(pid_file);
+    ASSERT_EQ(::mkfifo(pid_file.c_str(), 0600), 0);
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_WEB_USER, TAVO_DAEMON_RELOAD), 0);
+    EXPECT_THAT(test::ReadFile("/var/standin/httpd-user.log"), testing::Not(testing::HasSubstr("signal")));
+}
+
+TEST(NetService, RefusesAndLogs)
+{
+    test::CapturedLog log;
+    EXPECT_EQ(TAVONetService(0, TAVO_DAEMON_START), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_net_service"}));
+    ASSERT_EQ(log.Lines().size(), 1u);
+    EXPECT_THAT(log.Lines()[0].text, testing::MatchesRegex("service_net_service\\([0-9]+\\):  bad parameter"));
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_CRON, 5), -1);
+    EXPECT_THAT(ScriptCalls(), IsEmpty());
+}
+
+// Start scripts run under the dispatcher's locks: one that wants them waits for its own time-out, and no longer.
+TEST(NetService, ScriptThatLocksFailsInTime)
+{
+    test::WriteFile("/var/standin/S04crond.sh.hook",
+                    "#!/bin/sh\nexec tavoctl lock run --timeout 1 tavoinfo -- /bin/true\n", 0755);
+    const time_t before = ::time(nullptr);
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_CRON, TAVO_DAEMON_START), 0);
+    EXPECT_LE(::time(nullptr) - before, 8);
+    std::filesystem::remove("/var/standin/S04crond.sh.hook");
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_CRON, TAVO_DAEMON_START), static_cast<int>(TAVO_DAEMON_CRON));
+}
+
+TEST(NetService, TwoProcessesNeverInterleave)
+{
+    for (const char *script : {"S04crond.sh", "S99mDNS.sh"})
+        test::WriteFile(std::string("/var/standin/") + script + ".hook", "#!/bin/sh\nusleep 30000\n", 0755);
+    std::vector<pid_t> children;
+    for (int i = 0; i < 2; ++i) {
+        const pid_t child = ::fork();
+        if (child == 0) {
+            ErrTLIBFileCloseLock();
+            bool done = true;
+            for (int round = 0; round < 4; ++round)
+                done = TAVONetService(TAVO_DAEMON_CRON | TAVO_DAEMON_MDNS, TAVO_DAEMON_RESTART) > 0 && done;
+            ::_exit(!done);
+        }
+        children.push_back(child);
+    }
+    for (const pid_t child : children) {
+        int status = 0;
+        ::waitpid(child, &status, 0);
+        EXPECT_EQ(status, 0);
+    }
+    const std::vector<std::string> calls = ScriptCalls();
+    ASSERT_EQ(calls.size(), 16u);
+    for (size_t i = 0; i < calls.size(); i += 2) {
+        EXPECT_EQ(calls[i], "S04crond.sh restart");
+        EXPECT_EQ(calls[i + 1], "S99mDNS.sh restart");
+    }
+}
+
+TEST(ServiceActionSet, DrivesKeylessServicesByTheirDaemons)
+{
+    test::CapturedLog log;
+    EXPECT_EQ(TAVOServiceActionSet(21, TAVO_SERVICE_START), 0);
+    EXPECT_EQ(TAVOServiceActionSet(21, TAVO_SERVICE_RESTART), 0);
+    EXPECT_EQ(TAVOServiceActionSet(21, TAVO_SERVICE_DISABLE), 0);
+    EXPECT_THAT(ScriptCalls(), ElementsAre("S04crond.sh start", "S04crond.sh restart", "S04crond.sh stop"));
+    log.Clear();
+
+    for (const int action : {5, 6, 7, -1}) {
+        EXPECT_EQ(TAVOServiceActionSet(21, action), -1) << action;
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_action_set"})) << action;
+    }
+    EXPECT_THAT(log.Lines()[0].text,
+                testing::MatchesRegex("service_action_set:[0-9]+ Illegal action with Daemon crond"));
+
+    EXPECT_EQ(TAVOServiceActionSet(26, TAVO_SERVICE_START), -1) << "restore has no command";
+    EXPECT_EQ(LastFault(), (Fault{ERR_SERVICE_STD_ACTION, "service_action_set"}));
+    EXPECT_EQ(TAVOServiceActionSet(30, TAVO_SERVICE_START), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_SERVICE_ACTION, "service_action_set"}));
+}
+
+// Each service with a key, through every action: the key, the scripts and the links are what they must be.
+TEST_F(Services, EveryActionOfEveryKeyedService)
+{
+    const struct {
+        int id;
+        const char *key;
+        std::vector<std::string> start;
+        std::vector<std::string> stop;
+        std::vector<std::string> restart;
+    } rows[] = {
+        {0, "runweb", {"S97apache-user.sh start"}, {"S97apache-user.sh stop"}, {"S97apache-user.sh restart"}},
+        {1, "runphoto", {}, {}, {}},
+        {3, "download_enabled", {"S25download.sh start"}, {"S25download.sh stop"}, {"S25download.sh restart"}},
+        {4, "runmediaservice", {"S86tavodms.sh start"}, {"S86tavodms.sh stop"}, {"S86tavodms.sh restart"}},
+        {5,
+         "runaudiodeck",
+         {"S96tavorcd.sh start", "S96tavoaudiod.sh start", "S66tavoindexd.sh restart"},
+         {"S96tavorcd.sh stop", "S96tavoaudiod.sh stop", "S66tavoindexd.sh restart"},
+         {"S96tavorcd.sh restart", "S96tavoaudiod.sh restart", "S66tavoindexd.sh restart"}},
+        {6,
+         "runitunes",
+         {"S99iTunes.sh start", "S66tavoindexd.sh restart"},
+         {"S99iTunes.sh stop", "S66tavoindexd.sh restart"},
+         {"S99iTunes.sh restart", "S66tavoindexd.sh restart"}},
+        {7, "runmysql", {"S21mysql.sh start"}, {"S21mysql.sh stop"}, {"S21mysql.sh restart"}},
+        {8, "runpgsql", {"S20pgsql.sh start"}, {"S20pgsql.sh stop"}, {"S20pgsql.sh restart"}},
+        {10,
+         "runsurveillance",
+         {"S82surveillance.sh start"},
+         {"S82surveillance.sh stop"},
+         {"S82surveillance.sh restart"}},
+        {13, "runtelnet", {"S03inetd.sh restart"}, {"S03inetd.sh restart"}, {"S03inetd.sh restart"}},
+        {14, "runssh", {"S95sshd.sh start"}, {"S95sshd.sh stop"}, {"S95sshd.sh restart"}},
+        {15, "runnfs", {"S83nfsd.sh start"}, {"S83nfsd.sh stop"}, {"S83nfsd.sh restart"}},
+        {16, "runafp", {"S81atalk.sh start"}, {"S81atalk.sh stop"}, {"S81atalk.sh restart"}},
+        {17, "runsamba", {"S80samba.sh start"}, {"S80samba.sh stop"}, {"S80samba.sh restart"}},
+        {18, "runfiledeck", {}, {}, {}},
+        {19, "runHTTPS", {"S97apache-sys.sh restart"}, {"S97apache-sys.sh restart"}, {"S97apache-sys.sh restart"}},
+    };
+    for (const auto &row : rows) {
+        SCOPED_TRACE(row.key);
+        ScriptCalls();
+        EXPECT_EQ(TAVOServiceActionSet(row.id, TAVO_SERVICE_KEY_NO), 0);
+        EXPECT_EQ(Setting(row.key), "no");
+        EXPECT_EQ(TAVOServiceStatusGet(row.id), 0);
+        EXPECT_EQ(TAVOServiceActionSet(row.id, TAVO_SERVICE_KEY_YES), 0);
+        EXPECT_EQ(Setting(row.key), "yes");
+        EXPECT_THAT(ScriptCalls(), IsEmpty()) << "the key alone";
+
+        EXPECT_EQ(TAVOServiceActionSet(row.id, TAVO_SERVICE_ENABLE), 0);
+        EXPECT_EQ(Setting(row.key), "yes");
+        EXPECT_EQ(ScriptCalls(), row.start);
+        EXPECT_EQ(TAVOServiceStatusGet(row.id), 1);
+        for (const int32_t *share = TAVOServiceShareIDGet(row.id); *share != TAVO_SERVICE_SHARE_END; ++share)
+            EXPECT_EQ(TAVOServiceIsOnVolume(*share, "/volume2"), 1) << "the roomier one";
+
+        EXPECT_EQ(TAVOServiceActionSet(row.id, TAVO_SERVICE_STOP), 0);
+        EXPECT_EQ(ScriptCalls(), row.stop);
+        EXPECT_EQ(TAVOServiceActionSet(row.id, TAVO_SERVICE_START), 0);
+        EXPECT_EQ(TAVOServiceActionSet(row.id, TAVO_SERVICE_RESTART), 0);
+        auto started = row.start;
+        started.insert(started.end(), row.restart.begin(), row.restart.end());
+        EXPECT_EQ(ScriptCalls(), started);
+
+        EXPECT_EQ(TAVOServiceActionSet(row.id, TAVO_SERVICE_DISABLE), 0);
+        EXPECT_EQ(Setting(row.key), "no");
+        EXPECT_EQ(ScriptCalls(), row.stop);
+        EXPECT_EQ(TAVOServiceStatusGet(row.id), 0);
+        EXPECT_EQ(TAVOServiceActionSet(row.id, 7), -1);
+        EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+    }
+    EXPECT_TRUE(std::filesystem::is_directory("/volume2/web")) << "data is never deleted unasked";
+    EXPECT_EQ(LinkTarget("/var/services/web"), "");
+}
+
+TEST_F(Services, DataFoldersAreBoundInOrderAndNamedByTheirRule)
+{
+    ASSERT_EQ(TAVOServiceActionSet(4, TAVO_SERVICE_ENABLE), 0);
+    EXPECT_EQ(LinkTarget("/var/services/music"), "/volume2/music");
+    EXPECT_EQ(LinkTarget("/var/services/video"), "/volume2/video");
+    EXPECT_EQ(LinkTarget("/var/services/photo"), "/volume2/photo");
+    ASSERT_EQ(TAVOServiceActionSet(7, TAVO_SERVICE_ENABLE), 0);
+    EXPECT_EQ(LinkTarget("/var/services/mysql"), "/volume2/@database/mysql");
+    ASSERT_EQ(TAVOServiceActionSet(3, TAVO_SERVICE_ENABLE), 0);
+    EXPECT_EQ(LinkTarget("/var/services/download"), "/volume2/@download");
+
+    TAVOSERVICESHARE share;
+    ASSERT_EQ(TAVOServiceSettingGet(7, &share), 1);
+    EXPECT_STREQ(share.szShareName, "@database/mysql");
+    EXPECT_STREQ(share.szVolumePath, "/volume2") << "the database folders stand one level deeper";
+    EXPECT_EQ(share.fOnVolume, 1);
+    EXPECT_EQ(share.fSupported, 1);
+    EXPECT_EQ(share.fSpecialVolume, 0);
+
+    char volume[52];
+    EXPECT_EQ(TAVOServiceVolumeGetbyShare("photo", volume, sizeof volume), 9);
+    EXPECT_STREQ(volume, "/volume2");
+    EXPECT_EQ(TAVOServiceVolumeGetbyShare("nobody", volume, sizeof volume), 0);
+    EXPECT_EQ(LastFault(), (Fault{ERR_NO_SUCH_SHARE, "service_volume_getby_share"}));
+
+    // Photos are still wanted by the media server: disabling the photo service leaves them bound.
+    ASSERT_EQ(TAVOServiceActionSet(1, TAVO_SERVICE_ENABLE), 0);
+    ASSERT_EQ(TAVOServiceActionSet(1, TAVO_SERVICE_DISABLE), 0);
+    EXPECT_EQ(LinkTarget("/var/services/photo"), "/volume2/photo");
+}
+
+TEST_F(Services, TheOldVolumeIsKeptAndAFullDeskHasNone)
+{
+    char volume[52];
+    ASSERT_EQ(TAVOServiceSet(1, "/volume1"), 0);
+    EXPECT_EQ(TAVOServiceNewVolumeDecide(1, volume, sizeof volume), 1) << "where the data lies";
+    EXPECT_STREQ(volume, "/volume1");
+    std::filesystem::remove_all("/volume1/web");
+    EXPECT_EQ(TAVOServiceNewVolumeDecide(1, volume, sizeof volume), 2) << "the roomiest";
+
+    for (const char *path : {"/volume1", "/volume2"})
+        ::umount2(path, MNT_DETACH);
+    test::ForgetFault();
+    EXPECT_EQ(TAVOServiceNewVolumeDecide(1, volume, sizeof volume), 0);
+    EXPECT_EQ(LastFault(), (Fault{ERR_NO_SERVICE_VOLUME, "service_new_volume_decide"}));
+    ScriptCalls();
+    EXPECT_EQ(TAVOServiceActionSet(0, TAVO_SERVICE_ENABLE), -1);
+    EXPECT_EQ(Setting("runweb"), "no") << "nothing was switched";
+    EXPECT_THAT(ScriptCalls(), IsEmpty());
+}
+
+TEST_F(Services, AVolumeGoesAndComesBack)
+{
+    ASSERT_EQ(TAVOServiceActionSet(0, TAVO_SERVICE_ENABLE), 0);
+    ASSERT_EQ(TAVOServiceStatusGet(0), 1);
+    ASSERT_EQ(::umount2("/volume2", MNT_DETACH), 0);
+    EXPECT_EQ(TAVOServiceStatusGet(0), 0) << "its data is away";
+    TAVOSERVICESHARE share;
+    EXPECT_EQ(TAVOServiceSettingGet(1, &share), 0);
+    EXPECT_EQ(TAVOServiceIsOnVolume(1, "/volume2"), 1) << "that is where it belongs";
+
+    ASSERT_EQ(::mount("tmpfs", "/volume2", "tmpfs", 0, "size=8m"), 0);
+    ASSERT_EQ(::mkdir("/volume2/web", 0755), 0);
+    char volume[52];
+    EXPECT_EQ(TAVOServiceDataSearch(1, volume, sizeof volume), 2);
+    ScriptCalls();
+    EXPECT_EQ(TAVOServiceRestore("/volume2"), 1);
+    EXPECT_THAT(ScriptCalls(), ElementsAre("S97apache-user.sh start"));
+    EXPECT_EQ(TAVOServiceStatusGet(0), 1);
+    EXPECT_EQ(Setting("runweb"), "yes");
+
+    EXPECT_EQ(TAVOServiceRemovebyVolume("/volume2", 0), 0);
+    EXPECT_EQ(LinkTarget("/var/services/web"), "");
+    EXPECT_TRUE(std::filesystem::exists("/volume2/web"));
+}
+
+// The links' folder is open to everybody on some appliances: what stands in a link's place may be a trap.
+TEST_F(Services, NothingButALinkIsReplaced)
+{
+    std::filesystem::create_directories("/var/services");
+    ASSERT_EQ(::mkdir("/var/services/web", 0755), 0);
+    test::WriteFile("/var/services/web/precious", "x");
+    EXPECT_EQ(TAVOServiceLinkSet(1, "/volume1/web"), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_MKDIR_FAILED, "service_link_set"}));
+    EXPECT_EQ(TAVOServiceLinkRemove(1), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_REMOVE_FAILED, "service_link_remove"}));
+    EXPECT_EQ(test::ReadFile("/var/services/web/precious"), "x");
+
+    ASSERT_EQ(::mkdir("/volume1/elsewhere", 0755), 0);
+    ASSERT_EQ(::symlink("/volume1/elsewhere", "/volume1/photo"), 0);
+    EXPECT_EQ(TAVOServiceShareCreate(2, "/volume1"), -1) << "somebody's link is no data folder";
+    EXPECT_EQ(LastFault(), (Fault{ERR_MKDIR_FAILED, "service_share_create"}));
+
+    ASSERT_EQ(TAVOServiceSet(5, "/volume1"), 0);
+    ASSERT_EQ(::symlink("/volume1/elsewhere", "/volume1/video/link"), 0);
+    test::WriteFile("/volume1/elsewhere/kept", "x");
+    EXPECT_EQ(TAVOServiceRemove(5, 1), 0);
+    EXPECT_FALSE(std::filesystem::exists("/volume1/video"));
+    EXPECT_EQ(test::ReadFile("/volume1/elsewhere/kept"), "x");
+}
+
+TEST(ServiceVolumeGetbyLink, FollowsAndRefuses)
+{
+    const test::ScratchDir dir;
+    char volume[52];
+    char path[52];
+    const std::string link = dir / "link";
+    const auto follow = [&] {
+        return TAVOServiceVolumeGetbyLink(link.c_str(), volume, sizeof volume, path, sizeof path);
+    };
+
+    test::ForgetFault();
+    EXPECT_EQ(follow(), 0) << "no link";
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    ASSERT_EQ(::symlink("/nowhere/web", link.c_str()), 0);
+    EXPECT_EQ(follow(), 0);
+    EXPECT_STREQ(volume, "/nowhere/web");
+    EXPECT_STREQ(path, "/nowhere");
+
+    ::unlink(link.c_str());
+    ASSERT_EQ(::symlink(("/" + std::string(60, 'x')).c_str(), link.c_str()), 0);
+    EXPECT_EQ(follow(), -1) << "cut, it would name another folder";
+    EXPECT_EQ(LastFault(), (Fault{ERR_UNKNOWN, "service_volume_getby_link"}));
+    ::unlink(link.c_str());
+    test::WriteFile(link, "a file");
+    EXPECT_EQ(follow(), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_UNKNOWN, "service_volume_getby_link"}));
+
+    EXPECT_EQ(TAVOServiceVolumeGetbyLink("", volume, 52, path, 52), -1);
+    EXPECT_EQ(TAVOServiceVolumeGetbyLink(link.c_str(), nullptr, 52, path, 52), -1);
+    EXPECT_EQ(TAVOServiceVolumeGetbyLink(link.c_str(), volume, 0, path, 52), -1);
+    EXPECT_EQ(TAVOServiceVolumeGetbyLink(link.c_str(), volume, 52, path, -1), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_volume_getby_link"}));
+}
+
+TEST(ServiceEnableGet, TakesYesInAnyCase)
+{
+    const struct {
+        const char *value;
+        int enabled;
+    } rows[] = {{"yes", 1}, {"YES", 1}, {"no", 0}, {"1", 0}, {"yes and more", 0}};
+    for (const auto &row : rows) {
+        ASSERT_EQ(TLIBFileSetKeyValue("/etc/tavoinfo.conf", "runweb", row.value, nullptr), 1);
+        EXPECT_EQ(TAVOServiceEnableGet(1), row.enabled) << row.value;
+    }
+    EXPECT_EQ(TAVOServiceEnableGet(0), 0);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_enable_get"}));
+    EXPECT_EQ(TAVOServiceEnableGet(8), 0) << "the spooler has no key";
+}
+
+}  // namespace
