@@ -70,6 +70,12 @@ TEST(ListInsert, GrowsWhenTheCountedBytesAreUsedUp)
     EXPECT_EQ(holes->nFree, 0);
     EXPECT_STREQ(holes->pszItem[120], "abc");
 
+    // A string that just fits in twice the size.
+    List exact(PslTLIBSzListAlloc(0));
+    EXPECT_EQ(Insert(exact, 0, std::string(1000 - 5, 'x').c_str()), 0);
+    EXPECT_EQ(exact->nSize, 1024);
+    EXPECT_EQ(exact->nFree, 0);
+
     const std::string large(100000, 'y');
     EXPECT_EQ(Insert(holes, 121, large.c_str()), 121);
     EXPECT_EQ(holes->nSize, 512 * 256);
@@ -350,6 +356,17 @@ TEST(ListSets, OfAListWithItself)
         EXPECT_EQ(PslTLIBSzListSub(list.get(), list.get(), 0), list.get());
         EXPECT_THAT(Items(list.get()), IsEmpty());
     }
+}
+
+// A list that was only labelled as sorted may hold holes: they match nothing, not even an empty string that was stored.
+TEST(ListSets, HolesOfALabelledListMatchNothing)
+{
+    const List a = MakeList({"z", ""}, TLIB_SZLIST_SORTED);
+    List b = MakeList({});
+    Insert(b, 1, "z");
+    b->fMode = TLIB_SZLIST_SORTED;
+    const List both(PslTLIBSzListAnd(a.get(), b.get(), TLIB_SZLIST_NEW));
+    EXPECT_THAT(Items(both.get()), ElementsAre("z"));
 }
 
 TEST(ListDump2Str, JoinsWithinTheBuffer)
