@@ -7,6 +7,7 @@
 
 #include <cerrno>
 #include <cstdarg>
+#include <cstdio>
 #include <cstring>
 #include <filesystem>
 
@@ -102,6 +103,29 @@ void DeviceTree::AddAbsent(const std::string &path)
     ::close(socket);
 }
 
+const char *DeviceTree::Place(const char *path, char (&room)[4096]) const
+{
+    std::snprintf(room, sizeof room, "%s/%s", dir_.Path().c_str(), path);
+    return room;
+}
+
+void DeviceTree::NoteOpen(const char *path)
+{
+    const size_t size = std::strlen(path) + 1;
+    if (noted_ + size > sizeof notes_)
+        return;
+    std::memcpy(notes_ + noted_, path, size);
+    noted_ += size;
+}
+
+std::vector<std::string> DeviceTree::Opened() const
+{
+    std::vector<std::string> paths;
+    for (size_t at = 0; at < noted_; at += paths.back().size() + 1)
+        paths.emplace_back(notes_ + at);
+    return paths;
+}
+
 bool DeviceTree::IsDisk(ino_t inode, dev_t &number) const
 {
     const auto found = disks_.find(inode);
@@ -128,7 +152,8 @@ int open(const char *path, int flags, ...)
     if (!current || !current->Redirects(path))
         return real(path, flags, mode);
     current->NoteOpen(path);
-    return real(current->Place(path).c_str(), flags, mode);
+    char room[4096];
+    return real(current->Place(path, room), flags, mode);
 }
 
 ssize_t readlink(const char *path, char *buffer, size_t size)
@@ -136,7 +161,8 @@ ssize_t readlink(const char *path, char *buffer, size_t size)
     const auto real = Real<ssize_t(const char *, char *, size_t)>("readlink");
     if (!current || !current->Redirects(path))
         return real(path, buffer, size);
-    return real(current->Place(path).c_str(), buffer, size);
+    char room[4096];
+    return real(current->Place(path, room), buffer, size);
 }
 
 ssize_t __readlink_chk(const char *path, char *buffer, size_t size, size_t)
@@ -158,6 +184,7 @@ int glob(const char *pattern, int flags, int (*on_error)(const char *, int), glo
 {
     const auto real = Real<int(const char *, int, int (*)(const char *, int), glob_t *)>(test::kGlob);
     const bool redirected = current && current->Redirects(pattern);
-    return real(redirected ? current->Place(pattern).c_str() : pattern, flags, on_error, found);
+    char room[4096];
+    return real(redirected ? current->Place(pattern, room) : pattern, flags, on_error, found);
 }
 }
