@@ -8,7 +8,6 @@
 
 #include <csignal>
 #include <cstdlib>
-#include <filesystem>
 #include <string>
 #include <vector>
 
@@ -37,11 +36,11 @@ int StatusOf(const std::string &command)
     return output.Status();
 }
 
-size_t OpenDescriptors()
+int OpenDescriptors()
 {
-    size_t count = 0;
-    for ([[maybe_unused]] const auto &entry : std::filesystem::directory_iterator("/proc/self/fd"))
-        ++count;
+    int count = 0;
+    for (int fd = 0; fd < 1024; ++fd)
+        count += ::fcntl(fd, F_GETFD) >= 0;
     return count;
 }
 
@@ -103,6 +102,8 @@ TEST(RunCommand, LeavesNoZombieOfAnIgnoringCaller)
 
 TEST(RunCommand, FixedPathAndLocaleAndNothingInherited)
 {
+    if (::access("/proc/self/stat", F_OK) != 0)
+        GTEST_SKIP() << "needs /proc";
     ::setenv("PATH", "/nowhere", 1);
     ::setenv("LC_ALL", "tlh", 1);
     ::setenv("KEPT", "yes", 1);
@@ -126,7 +127,7 @@ TEST(RunCommand, FixedPathAndLocaleAndNothingInherited)
 
 TEST(RunCommand, ThousandRunsLeaveNothing)
 {
-    const size_t before = OpenDescriptors();
+    const int before = OpenDescriptors();
     for (int i = 0; i < 334; ++i) {
         RunCommand("exit 1");
         StatusOf("echo x; exit 1");

@@ -128,7 +128,10 @@ bool InChild(const std::function<bool()> &body)
 
 size_t OpenDescriptors()
 {
-    return static_cast<size_t>(std::distance(fs::directory_iterator("/proc/self/fd"), fs::directory_iterator()));
+    size_t count = 0;
+    for (int fd = 0; fd < 1024; ++fd)
+        count += ::fcntl(fd, F_GETFD) >= 0;
+    return count;
 }
 
 TEST(LockTable, IsTheKnownOne)

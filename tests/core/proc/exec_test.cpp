@@ -156,6 +156,7 @@ TEST(Exec, NoProcessLeft)
 
 TEST(Exec, Surroundings)
 {
+    SKIP_WITHOUT_PROC();
     ::setenv("PATH", "/bin:/own", 1);
     ::setenv("SECRET", "x", 1);
     ::signal(SIGPIPE, SIG_IGN);
@@ -189,6 +190,7 @@ TEST(Exec, Surroundings)
 // A program that is started while a settings file is locked must not keep the lock, least of all a daemon.
 TEST(Exec, DescriptorsAndLocks)
 {
+    SKIP_WITHOUT_PROC();
     const test::ScratchDir dir;
     const std::string out = dir / "out";
     const int open_one = ::open("/etc/passwd", O_RDONLY);  // not close-on-exec
@@ -225,6 +227,7 @@ TEST(Exec, DescriptorsAndLocks)
 // A caller without standard descriptors: /dev/null lands on one of them and must stay.
 TEST(Exec, FromAProcessThatHasClosedItsOwn)
 {
+    SKIP_WITHOUT_PROC();
     const test::ScratchDir dir;
     const std::string out = dir / "out";
     EXPECT_EQ(test::InChild([&] {
@@ -245,6 +248,7 @@ void OnChild(int)
 
 TEST(Exec, SignalsAreAtTheirDefaults)
 {
+    SKIP_WITHOUT_PROC();
     const test::ScratchDir dir;
     const std::string out = dir / "out";
     const std::string script = "grep -E '^Sig(Blk|Ign)' /proc/$$/status | tr -d '\\n\\t' > " + out;

@@ -111,6 +111,7 @@ TEST(PidFile, Refusals)
 // Root signals for others, so a file that somebody else could have written speaks for that somebody's processes only.
 TEST(PidFile, ForeignFilesSpeakForTheirOwnersProcesses)
 {
+    SKIP_WITHOUT_PROC();
     test::OwnChild victim([] { ::pause(); });
     test::OwnChild theirs([] { test::BecomeAndWait(kSomebody); });
     test::OwnChild gone([] {});
