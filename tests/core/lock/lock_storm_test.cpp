@@ -18,7 +18,7 @@ namespace {
 
 constexpr int kWriters = 50;
 constexpr int kReaders = 8;
-constexpr int kIncrements = 1000;
+constexpr int kIncrements = sizeof(void *) == 4 ? 100 : 1000;  // an emulated processor needs minutes for more
 
 // Two counters that only agree while nobody is in the middle of an increment.
 struct Shared {
@@ -114,7 +114,7 @@ TEST(LockStorm, SumsAreExactAmongReadersAndKilledHolders)
         ::waitpid(reader, &status, 0);
     }
     EXPECT_EQ(failures, 0);
-    EXPECT_GT(killed, 20);
+    EXPECT_GT(killed, 5);
     EXPECT_EQ(shared.first, long{kWriters} * kIncrements);
     EXPECT_EQ(shared.second, long{kWriters} * kIncrements);
     ::munmap(memory, sizeof(Shared));
