@@ -31,9 +31,9 @@ void Write(Shared &shared, int seed)
     for (int i = 0; i < kIncrements; ++i) {
         // Most wait in the kernel, some come and go; both must exclude each other.
         while (ErrTLIBFileLock(0x400u | (i % 7 == seed % 7 ? 6u : 2u), 0) != 0)
-            ::sched_yield();
+            ::usleep(500);  // spinning would keep the holder from its end
         shared.first = shared.first + 1;
-        if (i % 16 == 0)
+        if (i % 128 == 0)
             ::sched_yield();
         shared.second = shared.second + 1;
         if (ErrTLIBFileUnlock(0x400) != 0)
@@ -48,11 +48,10 @@ void Read(const Shared &shared)
         if (ErrTLIBFileLock(0x401, 0) != 0)
             ::_exit(2);
         const long first = shared.first;
-        ::sched_yield();
         if (first != shared.second || first != shared.first)
             ::_exit(3);
         ErrTLIBFileUnlock(0x400);
-        ::usleep(200);
+        ::usleep(2000);
     }
 }
 
