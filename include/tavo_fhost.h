@@ -35,7 +35,8 @@ TAVO_API uint32_t ErrFHOSTSendQueryPkt(void);
 /* Collects the hosts on the network: starts findhostd when it does not run (3 s more), sends the query, waits 10 s for
  * the answers, and moves the list to /tmp/tavods.list.tmp for TAVOFHOSTGet2Hash. Two callers at the same time take each
  * other's list.
- * Returns 0, or -1 when the daemon does not start, an interface could not send, or the list cannot be moved. */
+ * Returns 0, or -1 when the daemon does not start, an interface could not send, or the list cannot be made or moved.
+ * What somebody else left in the list's place is removed first. */
 TAVO_API int TAVOFHOSTDumpHost(void);
 
 /* Reads the collected list into the caller's hash *ppshHosts, which may move: a key "NAME(ADDRESS)" with the value

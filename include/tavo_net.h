@@ -35,7 +35,7 @@ enum { TAVO_NET_AGGR_NONE = 0, TAVO_NET_AGGR_LACP = 1, TAVO_NET_AGGR_ADAPTIVE = 
 typedef struct TAVONETLINKAGGR {
     char szBond[20];       /* "bond0" */
     int32_t nMode;         /* TAVO_NET_AGGR_NONE: no bond */
-    uint32_t fSlaveOption; /* 0: a dissolved bond gives back all its members; else only the members named here count */
+    uint32_t fSlaveOption; /* 0: of a dissolved bond members without a saved file, too, become plain interfaces (DHCP) */
     int32_t nMember;
     char rgszMember[TAVO_NET_MEMBERS][20];
     char szPartner[20]; /* of an 802.3ad bond, the hardware address of the switch; "" for none. Not set, only read */
@@ -123,8 +123,8 @@ TAVO_API int TAVONetDefaultGatewayGet(char *szGateway, int cbGateway);
 TAVO_API int TAVONetDefaultGatewayGetConf(char *szGateway, int cbGateway);
 
 /* Makes szGateway the default gateway and stores it. Returns 0, or -1 with the old gateway in force and stored and
- * ERR_BAD_PARAMETERS (NULL), ERR_INVALID_NETNAME, ERR_OP_FAILURE (it cannot be reached from any interface) or a code of
- * the settings files. */
+ * ERR_BAD_PARAMETERS (NULL), ERR_INVALID_NETNAME, ERR_LOCK_FAILED, ERR_OP_FAILURE (it cannot be reached from any
+ * interface) or a code of the settings files. */
 TAVO_API int TAVONetDefaultGatewaySet(const char *szGateway);
 
 /* The stored host name goes to szName (16 bytes always do). Returns 0, or -1 with ERR_BAD_PARAMETERS, ERR_KEY_NOT_FOUND
@@ -186,11 +186,12 @@ TAVO_API int TAVONetLinkAggrGet(const char *szBond, TAVONETLINKAGGR *pAggr);
 TAVO_API int TAVONetLinkAggrOptSlsaveAdd(TAVONETLINKAGGR *pAggr, const char *szInterface);
 
 /* Makes the bond as the record has it, or dissolves it. The network is stopped (/etc/rc.network), the interface files are
- * written (a member's old file is kept as ifcfg-NAME.saved and comes back when the bond is dissolved; the bond takes over
- * the first member's address), and the network is started again. Nothing is done when all is as asked. Wherever the
- * process dies, the files describe a network that starts.
- * Returns 0, or -1 with ERR_BAD_PARAMETERS, ERR_LOCK_FAILED, ERR_WRITE_FAILED (the saved files are back, the network is
- * started) or ERR_OP_FAILURE (the network did not start). */
+ * written (a member's old file is kept as ifcfg-NAME.saved and comes back when the bond is dissolved; a new bond takes over
+ * the first member's address, a changed one keeps its own), and the network is started again. Nothing is done when all is
+ * as asked. Wherever the process dies, the files describe a network that starts.
+ * Returns 0, or -1 with ERR_BAD_PARAMETERS, ERR_LINK_AGGR_TYPE (szBond is an interface that is no bond), ERR_LOCK_FAILED,
+ * ERR_WRITE_FAILED (either nothing was done, or the saved files are back and the network is started) or ERR_OP_FAILURE
+ * (the network did not start). */
 TAVO_API int TAVONetLinkAggrSet(const TAVONETLINKAGGR *pAggr);
 
 TAVO_END_DECLS

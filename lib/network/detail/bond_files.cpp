@@ -1,9 +1,13 @@
 // The interface files of a bond and of its members.
 #include "network/detail/bond_files.h"
 
+#include "network/detail/folder_names.h"
 #include "network/detail/interface_file.h"
+#include "network/detail/interface_name.h"
+#include "network/detail/kernel_interface.h"
 #include "network/detail/net_command.h"
 
+#include <algorithm>
 #include <cerrno>
 
 #include <sys/stat.h>
@@ -16,36 +20,68 @@ namespace {
 constexpr const char *kAddressKeys[] = {"BOOTPROTO", "IPADDR",   "NETMASK",  "BROADCAST",
                                         "NETWORK",   "IPV6INIT", "IPV6ADDR", "IPV6PREFIXLENG"};
 
+std::string SavedFile(const std::string &interface)
+{
+    return InterfaceFile(interface) + ".saved";
+}
+
 bool Exists(const std::string &path)
 {
     struct stat st;
     return ::lstat(path.c_str(), &st) == 0;
 }
 
-std::string SavedFile(const std::string &member)
+std::string Master(const std::string &interface)
 {
-    return InterfaceFile(member) + ".saved";
+    return ReadSetting(InterfaceFile(interface), "MASTER");
 }
 
+bool HasCopyToRestore(const std::string &interface)
+{
+    return Exists(SavedFile(interface)) && (!HasInterfaceFile(interface) || !Master(interface).empty());
+}
+
+// The file that describes the interface outside of any bond.
+std::string PlainFile(const std::string &interface)
+{
+    return HasCopyToRestore(interface) ? SavedFile(interface) : InterfaceFile(interface);
+}
+
+bool SyncPath(const char *path, int flags)
+{
+    const Fd fd = OpenFd(path, flags);
+    return fd && SyncFd(fd.Get());
+}
+
+// The copy must be on the disk before the file that it was made of changes.
 bool SaveMember(const std::string &member)
 {
     const std::string file = InterfaceFile(member);
-    return RunNetCommand("/bin/cp -f %s %s.saved", file, file) == 0;
+    return RunNetCommand("/bin/cp -f %s %s.saved", file, file) == 0 && SyncPath(SavedFile(member).c_str(), O_RDONLY);
 }
 
-bool WriteBondFile(const std::string &bond, BondMode mode, const std::string &first_member)
+bool RestoreMember(const std::string &member)
 {
+    const std::string file = InterfaceFile(member);
+    return RunNetCommand("/bin/mv -f %s.saved %s", file, file) == 0;
+}
+
+std::string BondText(const std::string &bond, BondMode mode, const std::string &first_member)
+{
+    const std::string file = InterfaceFile(bond);
     std::vector<SettingChange> changes = {
         {"DEVICE", bond}, {"ONBOOT", "yes"}, {"USERCTL", "no"}, {"BONDING_OPTS", std::string(BondOptions(mode))}};
-    for (const char *key : kAddressKeys) {
-        const std::string value = ReadSetting(SavedFile(first_member), key);
-        if (!value.empty())
-            changes.push_back({key, value});
+    // A bond that is only changed may have got an address of its own since it was made.
+    if (ReadSetting(file, "BOOTPROTO").empty()) {
+        for (const char *key : kAddressKeys) {
+            if (std::string value = ReadSetting(PlainFile(first_member), key); !value.empty())
+                changes.push_back({key, std::move(value)});
+        }
     }
-    return RewriteSettings(InterfaceFile(bond), changes) == 0;
+    return EditSettings(ReadKernelFile(file.c_str()).value_or(""), changes);
 }
 
-bool WriteMemberFile(const std::string &bond, const std::string &member)
+std::string MemberText(const std::string &bond, const std::string &member)
 {
     std::vector<SettingChange> changes = {
         {"DEVICE", member}, {"ONBOOT", "yes"}, {"MASTER", bond}, {"SLAVE", "yes"}, {"BOOTPROTO", "none"}};
@@ -53,44 +89,116 @@ bool WriteMemberFile(const std::string &bond, const std::string &member)
         if (std::string_view(key) != "BOOTPROTO")
             changes.push_back({key, std::nullopt});
     }
-    return RewriteSettings(InterfaceFile(member), changes) == 0;
+    return EditSettings(ReadKernelFile(PlainFile(member).c_str()).value_or(""), changes);
+}
+
+// Of a member whose copy is lost: any address will do but none.
+std::string PlainText(const std::string &member)
+{
+    const SettingChange changes[] = {{"DEVICE", member},
+                                     {"ONBOOT", "yes"},
+                                     {"BOOTPROTO", "dhcp"},
+                                     {"MASTER", std::nullopt},
+                                     {"SLAVE", std::nullopt}};
+    return EditSettings(ReadKernelFile(InterfaceFile(member).c_str()).value_or(""), changes);
 }
 
 }  // namespace
 
-std::vector<std::string> SavedMembers(const std::vector<std::string> &interfaces)
+bool HasInterfaceFile(const std::string &interface)
 {
+    return Exists(InterfaceFile(interface));
+}
+
+std::vector<std::string> MembersOnFile(const std::string &bond)
+{
+    constexpr std::string_view stem = "ifcfg-";
     std::vector<std::string> members;
-    for (const std::string &interface : interfaces) {
-        if (Exists(SavedFile(interface)))
-            members.push_back(interface);
+    for (const std::string &file : FolderNames(kInterfaceFolder)) {
+        if (!file.starts_with(stem) || file.ends_with(".saved"))
+            continue;
+        std::string interface = file.substr(stem.size());
+        // A file's own name for its interface tells it from the temporary ones that a crash leaves.
+        if (IsInterfaceName(interface) && Master(interface) == bond &&
+            ReadSetting(InterfaceFile(interface), "DEVICE") == interface)
+            members.push_back(std::move(interface));
     }
     return members;
 }
 
-bool DissolveBond(const std::string &bond, const std::vector<std::string> &members)
+bool BondChange::PrepareFile(NewFile &file, const std::string &interface, const std::string &text)
 {
-    bool done = true;
-    for (const std::string &member : SavedMembers(members)) {
-        const std::string file = InterfaceFile(member);
-        done = RunNetCommand("/bin/mv -f %s.saved %s", file, file) == 0 && done;
-    }
-    return done && (::unlink(InterfaceFile(bond).c_str()) == 0 || errno == ENOENT);
+    file.target = InterfaceFile(interface);
+    struct stat old;
+    const mode_t mode = ::stat(file.target.c_str(), &old) == 0 ? old.st_mode & 0777 : 0644;
+    return file.temp.CreateBeside(file.target) && WriteAll(file.temp.Descriptor(), text) &&
+           ::fchmod(file.temp.Descriptor(), mode) == 0 && SyncFd(file.temp.Descriptor()) && file.temp.Close();
 }
 
-bool WriteBond(const std::string &bond, BondMode mode, const std::vector<std::string> &members)
+bool BondChange::Prepare(const std::string &bond, BondMode mode, const std::vector<std::string> &members)
 {
-    for (const std::string &member : members) {
-        if (!SaveMember(member))
+    bond_ = bond;
+    std::vector<std::string> plain = members;
+    const std::vector<std::string> old = MembersOnFile(bond);
+    plain.insert(plain.end(), old.begin(), old.end());
+    std::sort(plain.begin(), plain.end());
+    plain.erase(std::unique(plain.begin(), plain.end()), plain.end());
+    std::copy_if(plain.begin(), plain.end(), std::back_inserter(restored_), HasCopyToRestore);
+    if (mode != BondMode::none)
+        members_ = members;
+
+    // What neither gets its copy back nor joins the new bond, and cannot stay as it is.
+    std::erase_if(plain, [&](const std::string &interface) {
+        return HasCopyToRestore(interface) || (HasInterfaceFile(interface) && Master(interface).empty()) ||
+               std::find(members_.begin(), members_.end(), interface) != members_.end();
+    });
+
+    member_files_ = std::vector<NewFile>(members_.size() + plain.size());
+    auto file = member_files_.begin();
+    for (const std::string &member : members_) {
+        if (!PrepareFile(*file++, member, MemberText(bond, member)))
             return false;
     }
-    if (!WriteBondFile(bond, mode, members.front()))
-        return false;
-    for (const std::string &member : members) {
-        if (!WriteMemberFile(bond, member))
+    for (const std::string &interface : plain) {
+        if (!PrepareFile(*file++, interface, PlainText(interface)))
             return false;
     }
-    return true;
+    return members_.empty() || PrepareFile(bond_file_, bond, BondText(bond, mode, members_.front()));
+}
+
+bool BondChange::Dissolve()
+{
+    const bool restored = std::all_of(restored_.begin(), restored_.end(), RestoreMember);
+    return restored && (::unlink(InterfaceFile(bond_).c_str()) == 0 || errno == ENOENT);
+}
+
+bool BondChange::Make()
+{
+    for (const std::string &member : members_) {
+        if (HasInterfaceFile(member) && !SaveMember(member))
+            return false;
+    }
+    return members_.empty() || bond_file_.temp.RenameTo(bond_file_.target);
+}
+
+void BondChange::PutBack()
+{
+    for (const std::string &member : members_) {
+        if (HasCopyToRestore(member))
+            RestoreMember(member);
+    }
+    ::unlink(InterfaceFile(bond_).c_str());
+}
+
+bool BondChange::Apply()
+{
+    const bool done = Dissolve() && Make() &&
+                      std::all_of(member_files_.begin(), member_files_.end(),
+                                  [](NewFile &file) { return file.temp.RenameTo(file.target); });
+    if (!done)
+        PutBack();
+    SyncPath(kInterfaceFolder, O_RDONLY | O_DIRECTORY);
+    return done;
 }
 
 }  // namespace tavo

@@ -1,10 +1,13 @@
 // The interface files of a bond and of its members.
 //
 // A process may die between any two of the steps, so they are ordered for a network that starts whatever was reached:
-// copies of the members' files first, then the bond's file, then the members'; and backwards when a bond is dissolved.
+// copies of the members' files first, then the bond's file, then the members'; when a bond is dissolved the members'
+// files first, then the bond's. A copy counts only while the file that it was made of names a bond: else it is the
+// remainder of a change that was cut off, and maybe half a file.
 #ifndef TAVO_NETWORK_DETAIL_BOND_FILES_H
 #define TAVO_NETWORK_DETAIL_BOND_FILES_H
 
+#include "core/detail/file_rewrite.h"
 #include "network/detail/bonding.h"
 
 #include <string>
@@ -12,12 +15,38 @@
 
 namespace tavo {
 
-// The members that have a saved copy of their file: what an earlier bond, or one that was never finished, left.
-std::vector<std::string> SavedMembers(const std::vector<std::string> &interfaces);
+// The interfaces whose files say that they are members of the bond; in no order.
+std::vector<std::string> MembersOnFile(const std::string &bond);
 
-// True when every step succeeded.
-bool DissolveBond(const std::string &bond, const std::vector<std::string> &members);
-bool WriteBond(const std::string &bond, BondMode mode, const std::vector<std::string> &members);
+bool HasInterfaceFile(const std::string &interface);
+
+// One change of a bond, from preparation to the last file.
+class BondChange {
+  public:
+    // Writes all new files beside the old ones: what can fail for lack of room fails here, while the network still
+    // runs. Mode none dissolves; `members` are then those that become plain interfaces even without a copy to restore.
+    bool Prepare(const std::string &bond, BondMode mode, const std::vector<std::string> &members);
+
+    // Puts them in place. When it fails the members' saved files are back and there is no bond.
+    bool Apply();
+
+  private:
+    struct NewFile {
+        std::string target;
+        TempFile temp;
+    };
+
+    bool PrepareFile(NewFile &file, const std::string &interface, const std::string &text);
+    bool Dissolve();
+    bool Make();
+    void PutBack();
+
+    std::string bond_;
+    std::vector<std::string> members_;   // of the new bond
+    std::vector<std::string> restored_;  // get their saved file back first
+    NewFile bond_file_;
+    std::vector<NewFile> member_files_;  // members of the new bond, or plain interfaces of a dissolved one
+};
 
 }  // namespace tavo
 

@@ -2,19 +2,42 @@
 #include "network/detail/dhcp_client.h"
 
 #include "core/detail/pid_file.h"
+#include "core/detail/process_list.h"
 
 #include <cerrno>
 #include <csignal>
 
 namespace tavo {
 
+namespace {
+
+// The file outlives a crash of the client, and its number may be anybody's by then.
+bool IsDhcpClient(pid_t pid)
+{
+    for (const Process &process : pid > 0 ? ListProcesses() : std::vector<Process>()) {
+        const std::string_view program = std::string_view(process.command).substr(0, process.command.find(' '));
+        if (process.pid == pid)
+            return program.substr(program.rfind('/') + 1).starts_with("dhcpcd");
+    }
+    return false;
+}
+
+}  // namespace
+
 std::string DhcpPidFile(const std::string &interface)
 {
     return "/etc/dhcpc/dhcpcd-" + interface + ".pid";
 }
 
-ClientEnd KillDhcpClient(const std::string &interface) noexcept
+std::string DhcpLeaseFile(const std::string &interface)
 {
+    return "/etc/dhcpc/dhcpcd-" + interface + ".info";
+}
+
+ClientEnd KillDhcpClient(const std::string &interface)
+{
+    if (!IsDhcpClient(ReadPidFile(DhcpPidFile(interface).c_str()).value_or(0)))
+        return ClientEnd::gone;
     if (SignalByPidFile(DhcpPidFile(interface).c_str(), SIGKILL) == PidSignal::failed && errno != ESRCH)
         return ClientEnd::alive;
     return ClientEnd::gone;

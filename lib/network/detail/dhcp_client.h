@@ -14,7 +14,10 @@ enum class ClientEnd {
 };
 
 // One attempt. A pid file that names no process, or somebody else's, names no client.
-ClientEnd KillDhcpClient(const std::string &interface) noexcept;
+ClientEnd KillDhcpClient(const std::string &interface);
+
+// The lease that the client noted: its file, with IPADDR and NETMASK.
+std::string DhcpLeaseFile(const std::string &interface);
 
 }  // namespace tavo
 

@@ -4,6 +4,7 @@
 #include "tavo_file.h"
 
 #include "core/detail/file_rewrite.h"
+#include "core/detail/keep_fault.h"
 #include "core/detail/key_value_line.h"
 #include "core/detail/line_reader.h"
 
@@ -63,6 +64,7 @@ int RewriteSettings(const std::string &path, std::span<const SettingChange> chan
 
 std::string ReadSetting(const std::string &path, const char *key)
 {
+    const KeepFault keep;
     char value[256];
     const int length = TLIBFileGetKeyValue(path.c_str(), key, value, sizeof value, 0);
     return length > 0 ? std::string(value, static_cast<size_t>(length - 1)) : "";

@@ -50,6 +50,12 @@ std::optional<Ipv4> ParseIpv4(std::string_view text) noexcept
     return address;
 }
 
+bool IsHostAddress(const Ipv4 &address) noexcept
+{
+    const int first = address.octet[0];
+    return first != 0 && first != 127 && first <= 223 && address.octet[3] <= 254;
+}
+
 std::optional<int> PrefixLength(const Ipv4 &mask) noexcept
 {
     const uint32_t word = mask.Word();

@@ -3,10 +3,10 @@
 
 #include "core/detail/open_file.h"
 #include "core/detail/text_fields.h"
+#include "network/detail/folder_names.h"
 
 #include <algorithm>
 #include <cstring>
-#include <filesystem>
 
 #include <arpa/inet.h>
 #include <net/if.h>
@@ -21,8 +21,7 @@ constexpr const char *kClass = "/sys/class/net/";
 // An Ethernet device, a bond included, that is not the member of another one.
 bool IsWired(const std::string &interface)
 {
-    struct stat st;
-    return InterfaceAttribute(interface, "type") == "1" && ::lstat((kClass + interface + "/master").c_str(), &st) != 0;
+    return InterfaceAttribute(interface, "type") == "1" && !OpenFd((kClass + interface + "/master").c_str(), O_PATH);
 }
 
 // By the letters, then by the number behind them.
@@ -53,11 +52,9 @@ std::optional<Ipv4> Ask(int socket, const std::string &interface, unsigned long 
 std::vector<std::string> WiredInterfaces()
 {
     std::vector<std::string> names;
-    std::error_code failed;
-    for (const auto &entry : std::filesystem::directory_iterator(kClass, failed)) {
-        const std::string name = entry.path().filename();
+    for (std::string &name : FolderNames(kClass)) {
         if (IsWired(name))
-            names.push_back(name);
+            names.push_back(std::move(name));
     }
     std::sort(names.begin(), names.end(), ComesBefore);
     return names;

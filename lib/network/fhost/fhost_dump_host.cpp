@@ -5,11 +5,11 @@
 
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
+#include "core/detail/open_file.h"
 #include "core/detail/process_list.h"
-#include "core/detail/run_command.h"
-#include "core/detail/shell_command.h"
 #include "network/detail/host_list.h"
 
+#include <cerrno>
 #include <cstdio>
 
 #include <sys/stat.h>
@@ -40,13 +40,22 @@ bool StartDaemon()
     return TLIBReadPidFile(kPidFile) > 0;
 }
 
-// A link in the list's place stays where it is: the daemon writes through no link, so nothing would be collected.
-bool MakeList()
+// In /tmp somebody else may have put what the daemon would write through: another's file, a link, one of two names of a
+// file of the system.
+bool IsOurList()
 {
     struct stat st;
-    if (::lstat(tavo::kHostList, &st) == 0)
-        return S_ISREG(st.st_mode);
-    return tavo::RunCommand(*tavo::ShellCommand("/bin/touch %s > /dev/null 2>&1", tavo::kHostList)) == 0;
+    return ::lstat(tavo::kHostList, &st) == 0 && S_ISREG(st.st_mode) && st.st_nlink == 1 &&
+           (st.st_uid == 0 || st.st_uid == ::geteuid());
+}
+
+bool MakeList()
+{
+    if (IsOurList())
+        return true;
+    if (::unlink(tavo::kHostList) != 0 && errno != ENOENT)
+        return false;
+    return static_cast<bool>(tavo::OpenFd(tavo::kHostList, O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, 0644));
 }
 
 }  // namespace

@@ -12,7 +12,8 @@
 
 namespace {
 
-// The list lies where everybody may put one: only root's, the caller's or the daemon's own regular file is read.
+// The list lies where everybody may put one, so only a regular file of root or the caller is read. Of the daemon it is
+// the part that keeps root's rights that writes the list; the part that listens to the network has none and only tells it.
 tavo::Fd OpenList()
 {
     tavo::Fd fd = tavo::OpenRegular(tavo::kHostListTaken, O_RDONLY | O_NOFOLLOW);

@@ -17,6 +17,13 @@ namespace {
 constexpr int kInterfaces = 8;
 constexpr uint16_t kPort = 9999;
 
+// These lines name neither module nor line.
+template <class... Args>
+void Log(const char *format, const Args &...args)
+{
+    tavo::WriteLog(LOG_ERR, format, {args...});
+}
+
 sockaddr_in Address(in_addr_t address, uint16_t port)
 {
     sockaddr_in where{};
@@ -35,24 +42,24 @@ bool SendFrom(const char *source_text, const void *packet, size_t size)
 {
     const tavo::Fd socket(::socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0));
     if (!socket) {
-        LogError("create socket error.");
+        Log("create socket error.");
         return false;
     }
     // Bound to the interface's address the broadcast leaves by that interface and no other.
     const sockaddr_in source = Address(::inet_addr(source_text), 0);
     if (::bind(socket.Get(), Generic(source), sizeof source) != 0) {
-        LogError("bind(sockfd=%d, brdcast.sin_addr.s_addr = %lu) error!! errno=%d, err_str=[%s]", socket.Get(),
-                 source.sin_addr.s_addr, errno, std::strerror(errno));
+        Log("bind(sockfd=%d, brdcast.sin_addr.s_addr = %lu) error!! errno=%d, err_str=[%s]", socket.Get(),
+            source.sin_addr.s_addr, errno, std::strerror(errno));
         return false;
     }
     const int on = 1;
     if (::setsockopt(socket.Get(), SOL_SOCKET, SO_BROADCAST, &on, sizeof on) != 0) {
-        LogError("set socket option error.");
+        Log("set socket option error.");
         return false;
     }
     const sockaddr_in everybody = Address(INADDR_BROADCAST, kPort);
     if (::sendto(socket.Get(), packet, size, 0, Generic(everybody), sizeof everybody) != static_cast<ssize_t>(size)) {
-        LogError("sendto error.");
+        Log("sendto error.");
         return false;
     }
     return true;

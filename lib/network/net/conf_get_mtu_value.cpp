@@ -4,10 +4,25 @@
 #include "tavo_file.h"
 
 #include "core/detail/fault.h"
+#include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
 #include "network/detail/interface_name.h"
 #include "network/detail/mtu_setting.h"
 #include "network/detail/net_buffer.h"
+
+#include <cstring>
+
+namespace {
+
+// An interface for which none is stored has the default: that is no failure.
+template <size_t Size>
+bool Read(const char *interface, char (&value)[Size])
+{
+    const tavo::KeepFault keep;
+    return TLIBFileGetKeyValue("/etc/tavoinfo.conf", tavo::MtuKey(interface).text, value, Size, 0) > 1;
+}
+
+}  // namespace
 
 extern "C" int TAVOConfGetMTUValue(const char *szInterface, char *szMtu, int cbMtu)
 {
@@ -18,9 +33,7 @@ extern "C" int TAVOConfGetMTUValue(const char *szInterface, char *szMtu, int cbM
         return Fail(ERR_BAD_PARAMETERS);
     }
     char value[16] = "";
-    const int length =
-        TLIBFileGetKeyValue("/etc/tavoinfo.conf", tavo::MtuKey(szInterface).text, value, sizeof value, 0);
-    if (!tavo::ToBuffer(length > 1 ? value : tavo::kMtuDefault, szMtu, cbMtu))
-        return Fail(ERR_NOT_ENOUGH_MEMORY);
-    return 0;
+    if (!Read(szInterface, value))
+        std::strcpy(value, tavo::kMtuDefault);
+    return tavo::ToBuffer(value, szMtu, cbMtu) ? 0 : Fail(ERR_NOT_ENOUGH_MEMORY);
 }

@@ -5,8 +5,10 @@
 #include "core/detail/guard.h"
 #include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
+#include "network/detail/ipv4_text.h"
 #include "network/detail/network_lock.h"
 
+#include <cerrno>
 #include <cstring>
 #include <string>
 
@@ -16,10 +18,13 @@ namespace {
 
 constexpr const char *kResolver = "/etc/resolv.conf";
 
-bool IsServer(const char *text)
+// The address as the resolver reads it, to whom "010" is 8; empty for what is none.
+std::string ServerText(const char *text)
 {
+    if (const auto address = tavo::ParseIpv4(text))
+        return tavo::IsHostAddress(*address) ? address->Text() : "";
     in6_addr address;
-    return BlTLIBIsIpAddr(text) || ::inet_pton(AF_INET6, text, &address) == 1;
+    return ::inet_pton(AF_INET6, text, &address) == 1 ? text : "";
 }
 
 // The log tells which step failed; the old file stands whichever it was.
@@ -40,9 +45,10 @@ extern "C" int TAVONetDNSSet(const TLIBSZLIST *pServers)
     return Guard([&] {
         std::string text;
         for (int i = 0; i < pServers->nItem; ++i) {
-            const char *server = SzTLIBSzListGet(pServers, i);
-            if (!IsServer(server)) {
-                LogError("%s (%d) Bad DNS %s", server);
+            const char *const given = SzTLIBSzListGet(pServers, i);
+            const std::string server = ServerText(given);
+            if (server.empty()) {
+                LogError("%s (%d) Bad DNS %s", given);
                 return Fail(ERR_INVALID_NETNAME);
             }
             text.append("nameserver\t").append(server).append("\n");

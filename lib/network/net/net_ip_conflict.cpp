@@ -7,17 +7,19 @@
 #include "network/detail/kernel_interface.h"
 #include "network/detail/net_command.h"
 
+#include <cerrno>
 #include <cstring>
 
 extern "C" int TAVOIIpConflict(const char *szInterface, const char *szAddr)
 {
-    if (!szInterface || !tavo::IsInterfaceName(szInterface) || !szAddr || !tavo::ParseIpv4(szAddr))
+    const auto address = szAddr ? tavo::ParseIpv4(szAddr) : std::nullopt;
+    if (!szInterface || !tavo::IsInterfaceName(szInterface) || !address)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         const auto own = tavo::AddressOf(szInterface);
-        if (own && own->address.octet == tavo::ParseIpv4(szAddr)->octet)
+        if (own && own->address.octet == address->octet)
             return 0;
-        const auto command = tavo::ShellCommand("/bin/ping -c 1 -w 2 %s > /dev/null 2>&1", szAddr);
+        const auto command = tavo::ShellCommand("/bin/ping -c 1 -w 2 %s > /dev/null 2>&1", address->Text());
         const int status = command ? tavo::RunCommand(*command) : -1;
         if (status == -1 || status == 127) {
             LogError("%s(%d): system(%s) failed.(strerror=%s)", command.value_or(""), std::strerror(errno));

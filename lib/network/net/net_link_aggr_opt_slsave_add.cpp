@@ -10,7 +10,8 @@
 
 extern "C" int TAVONetLinkAggrOptSlsaveAdd(TAVONETLINKAGGR *pAggr, const char *szInterface)
 {
-    if (!pAggr || !szInterface || !tavo::IsInterfaceName(szInterface))
+    if (!pAggr || pAggr->nMember < 0 || pAggr->nMember > TAVO_NET_MEMBERS || !szInterface ||
+        !tavo::IsInterfaceName(szInterface))
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         // A bond is no member of a bond, and neither is what is not Ethernet.
@@ -18,10 +19,10 @@ extern "C" int TAVONetLinkAggrOptSlsaveAdd(TAVONETLINKAGGR *pAggr, const char *s
             !tavo::InterfaceAttribute(szInterface, "bonding/mode").empty())
             return Fail(ERR_LINK_AGGR_TYPE);
         for (int i = 0; i < pAggr->nMember; ++i) {
-            if (std::strcmp(pAggr->rgszMember[i], szInterface) == 0)
+            if (std::strncmp(pAggr->rgszMember[i], szInterface, sizeof pAggr->rgszMember[i]) == 0)
                 return 0;
         }
-        if (pAggr->nMember < 0 || pAggr->nMember >= TAVO_NET_MEMBERS)
+        if (pAggr->nMember == TAVO_NET_MEMBERS)
             return Fail(ERR_LINK_AGGR_OPTION);
         tavo::ToBuffer(szInterface, pAggr->rgszMember[pAggr->nMember++], sizeof pAggr->rgszMember[0]);
         return 0;

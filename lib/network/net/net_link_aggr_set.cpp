@@ -2,8 +2,10 @@
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"
+#include "core/detail/keep_fault.h"
 #include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
+#include "core/detail/text_fields.h"
 #include "network/detail/bond_files.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/interface_name.h"
@@ -12,7 +14,6 @@
 #include "network/detail/network_lock.h"
 
 #include <cstring>
-#include <filesystem>
 
 namespace {
 
@@ -29,62 +30,42 @@ bool IsSound(const TAVONETLINKAGGR &aggr)
         if (::strnlen(member, sizeof aggr.rgszMember[i]) == sizeof aggr.rgszMember[i] ||
             !tavo::IsInterfaceName(member) || std::strcmp(member, aggr.szBond) == 0)
             return false;
+        for (int other = 0; other < i; ++other) {
+            if (std::strcmp(member, aggr.rgszMember[other]) == 0)
+                return false;
+        }
     }
     return true;
 }
 
+// As the kernel has it; an application that died may have left files that say otherwise.
 bool IsAsItIs(const TAVONETLINKAGGR &aggr)
 {
+    const tavo::KeepFault keep;
     TAVONETLINKAGGR now;
     if (TAVONetLinkAggrGet(aggr.szBond, &now) != 0 || now.nMode != aggr.nMode || now.nMember != aggr.nMember)
         return false;
+    std::vector<std::string> on_file = tavo::MembersOnFile(aggr.szBond);
     for (int i = 0; i < aggr.nMember; ++i) {
-        if (std::strcmp(now.rgszMember[i], aggr.rgszMember[i]) != 0)
+        if (std::strcmp(now.rgszMember[i], aggr.rgszMember[i]) != 0 || std::erase(on_file, aggr.rgszMember[i]) != 1)
             return false;
     }
-    return aggr.nMode != 0 || tavo::SavedMembers({}).empty();
+    return on_file.empty() && tavo::HasInterfaceFile(aggr.szBond) == (aggr.nMode != TAVO_NET_AGGR_NONE);
 }
 
-std::vector<std::string> MembersOf(const TAVONETLINKAGGR &aggr)
+// The name of something else that the kernel has, such as a card, whose file would be lost.
+bool IsOtherInterface(const char *name)
 {
-    return {aggr.rgszMember, aggr.rgszMember + aggr.nMember};
-}
-
-// Every interface with a file of its own: of an older bond the members are among them.
-std::vector<std::string> ConfiguredInterfaces()
-{
-    constexpr std::string_view stem = "ifcfg-";
-    std::vector<std::string> names;
-    std::error_code failed;
-    for (const auto &entry : std::filesystem::directory_iterator(tavo::kInterfaceFolder, failed)) {
-        const std::string file = entry.path().filename();
-        if (file.starts_with(stem) && tavo::IsInterfaceName(file.substr(stem.size())) && !file.ends_with(".saved"))
-            names.push_back(file.substr(stem.size()));
-    }
-    return names;
-}
-
-// Where writing fails half-way the saved files come back: the network then starts as it was before.
-bool WriteFiles(const TAVONETLINKAGGR &aggr)
-{
-    const std::vector<std::string> interfaces = ConfiguredInterfaces();
-    if (!tavo::DissolveBond(aggr.szBond, interfaces))
-        return false;
-    if (aggr.nMode == 0 || tavo::WriteBond(aggr.szBond, static_cast<tavo::BondMode>(aggr.nMode), MembersOf(aggr)))
-        return true;
-    tavo::DissolveBond(aggr.szBond, interfaces);
-    return false;
+    return !tavo::InterfaceAttribute(name, "type").empty() && tavo::InterfaceAttribute(name, "bonding/mode").empty();
 }
 
 // A bond that is dissolved gives its members back as plain interfaces, whether or not the caller named them.
 void AddPhysicalMembers(TAVONETLINKAGGR &aggr)
 {
+    const tavo::KeepFault keep;
     const std::string members = tavo::InterfaceAttribute(aggr.szBond, "bonding/slaves");
-    for (size_t begin = 0; begin < members.size();) {
-        const size_t end = std::min(members.find(' ', begin), members.size());
-        TAVONetLinkAggrOptSlsaveAdd(&aggr, members.substr(begin, end - begin).c_str());
-        begin = end + 1;
-    }
+    for (const std::string_view member : tavo::SplitFields(members))
+        TAVONetLinkAggrOptSlsaveAdd(&aggr, std::string(member).c_str());
 }
 
 }  // namespace
@@ -94,24 +75,30 @@ extern "C" int TAVONetLinkAggrSet(const TAVONETLINKAGGR *pAggr)
     if (!pAggr || !IsSound(*pAggr))
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
+        if (IsOtherInterface(pAggr->szBond))
+            return Fail(ERR_LINK_AGGR_TYPE);
         if (IsAsItIs(*pAggr))
             return 0;
         const tavo::LockHold lock(tavo::kNetworkExclusive, tavo::kNetworkSeconds);
         if (!lock)
             return Fail(ERR_LOCK_FAILED);
         TAVONETLINKAGGR aggr = *pAggr;
-        if (aggr.nMode == 0 && aggr.fSlaveOption == 0)
+        if (aggr.nMode == TAVO_NET_AGGR_NONE && aggr.fSlaveOption == 0)
             AddPhysicalMembers(aggr);
 
-        tavo::RunNetCommand("/etc/rc.network stop > /dev/null 2>&1");
-        const bool written = WriteFiles(aggr);
-        const bool started = tavo::RunNetCommand("/etc/rc.network start > /dev/null 2>&1") == 0;
+        tavo::BondChange change;
+        const std::vector<std::string> members(aggr.rgszMember, aggr.rgszMember + aggr.nMember);
+        bool written = change.Prepare(aggr.szBond, static_cast<tavo::BondMode>(aggr.nMode), members);
+        bool started = true;
+        if (written) {
+            tavo::RunNetCommand("/etc/rc.network stop > /dev/null 2>&1");
+            written = change.Apply();
+            started = tavo::RunNetCommand("/etc/rc.network start > /dev/null 2>&1") == 0;
+        }
         if (!written) {
             LogError("%s:%d Set %s error.", tavo::InterfaceFile(aggr.szBond));
             return Fail(ERR_WRITE_FAILED);
         }
-        if (!started)
-            return Fail(ERR_OP_FAILURE);
-        return 0;
+        return started ? 0 : Fail(ERR_OP_FAILURE);
     });
 }

@@ -13,6 +13,7 @@
 #include "network/detail/net_command.h"
 #include "network/detail/network_lock.h"
 
+#include <cerrno>
 #include <csignal>
 #include <cstring>
 
@@ -30,10 +31,11 @@ int Configure(const char *interface, const tavo::Ipv4 &address, const tavo::Ipv4
                                address.Text(), mask.Text(), broadcast.Text());
 }
 
-// The settings that the interface had before; its file has not been touched by then.
+// The settings that the interface had before: its file has not been touched by then, or its client noted the lease.
 void Recover(const char *interface)
 {
-    const std::string file = tavo::InterfaceFile(interface);
+    const std::string own = tavo::InterfaceFile(interface);
+    const std::string file = tavo::ReadSetting(own, "BOOTPROTO") == "dhcp" ? tavo::DhcpLeaseFile(interface) : own;
     const auto address = tavo::ParseIpv4(tavo::ReadSetting(file, "IPADDR"));
     const auto mask = tavo::ParseIpv4(tavo::ReadSetting(file, "NETMASK"));
     if (address && mask && Configure(interface, *address, *mask) != 0)
@@ -59,8 +61,11 @@ bool EndClient(const char *interface)
 
 int UseDhcp(const char *interface)
 {
-    if (!EndClient(interface) ||
-        tavo::RunNetCommand("/sbin/dhcpcd -n %s -t %d > /dev/null 2>&1", interface, kDhcpSeconds) != 0) {
+    if (!EndClient(interface)) {
+        Recover(interface);
+        return Fail(ERR_OP_FAILURE);
+    }
+    if (tavo::RunNetCommand("/sbin/dhcpcd -n %s -t %d > /dev/null 2>&1", interface, kDhcpSeconds) != 0) {
         LogError("%s(%d) run dhcpcd error %s", std::strerror(errno));
         Recover(interface);
         return Fail(ERR_OP_FAILURE);
