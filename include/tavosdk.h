@@ -14,6 +14,7 @@
 #include "tavo_hash.h"
 #include "tavo_list.h"
 #include "tavo_lock.h"
+#include "tavo_lvm.h"
 #include "tavo_net.h"
 #include "tavo_partition.h"
 #include "tavo_proc.h"

@@ -1,4 +1,4 @@
-// Runs the commands that change a disk's partitions.
+// Runs the commands that change disks, partitions, arrays and volumes.
 #ifndef TAVO_STORAGE_DETAIL_PARTITION_COMMAND_H
 #define TAVO_STORAGE_DETAIL_PARTITION_COMMAND_H
 

@@ -1,0 +1,140 @@
+/*
+ * LVM: physical volumes, volume groups and logical volumes on the data arrays.
+ *
+ * On models with RAID every data array is a physical volume; those of one storage space form a volume group, whose path
+ * starts with "/dev/vg", and one logical volume fills it. Without RAID there is no LVM: the readers find nothing then, and
+ * run no tool.
+ *
+ * A physical volume is "/dev/" and a kernel name. A volume group is "/dev/vg" and letters, digits, "_.+-". Other text is
+ * refused before any program runs. All is done by the LVM tools. Nothing is locked. Failures are logged; a code is
+ * recorded only where one is named.
+ */
+#ifndef TAVO_LVM_H
+#define TAVO_LVM_H
+
+#include "tavo_error.h"
+#include "tavo_list.h"
+
+TAVO_BEGIN_DECLS
+
+typedef struct LVMPV {
+    char szPv[128];   /* "/dev/md2" */
+    char szVg[128];   /* "/dev/vg1"; empty without a group, and for a group whose name does not start with "vg" */
+    char szUuid[256]; /* of the group */
+    int32_t nPv;      /* physical volumes of the group */
+} LVMPV;
+
+typedef struct LVMPVLIST {
+    LVMPV pv;
+    struct LVMPVLIST *pNext;
+} LVMPVLIST;
+
+typedef struct LVMVG {
+    char szVg[128];
+    char szUuid[256];
+} LVMVG;
+
+typedef struct LVMVGINFO {
+    char szVg[128];
+    char szUuid[256];
+    int32_t nPv;
+    int32_t fValid;     /* 1 when LVMVgSB2Info has filled it */
+    TLIBSZLIST *pslPvs; /* belongs to the record; may move */
+} LVMVGINFO;
+
+typedef struct LVMVGLIST {
+    LVMVGINFO *pInfo;
+    struct LVMVGLIST *pNext;
+} LVMVGLIST;
+
+/* What LVMVgSBListSearch looks for; either may be NULL. */
+typedef struct LVMVGKEY {
+    const char *szVg;
+    const char *szPv;
+} LVMVGKEY;
+
+/* Whether the model uses LVM: 1 or 0. */
+TAVO_API int LVMIsSupport(void);
+
+/* --- physical volumes --- */
+
+/* Makes a physical volume; what is on the device is lost. Returns 0 or -1. */
+TAVO_API int LVMPvCreate(const char *szDevice);
+
+/* Has every physical volume of the group use the whole of its device. Returns 0; -1 when one failed, the others are grown
+ * all the same. */
+TAVO_API int LVMPvExpand(const LVMVGINFO *pInfo);
+
+/* Reads one physical volume into the caller's record: 1; 0 when the device is none; -1. The record is only written with
+ * 1. */
+TAVO_API int LVMPvSBGet(const char *szDevice, LVMPV *pPv);
+
+/* Reads all physical volumes. Returns their number and a list for LVMPvSBListFree, NULL for none; -1 with *ppList NULL. */
+TAVO_API int LVMPvSBEnum(LVMPVLIST **ppList);
+
+/* Reads a line "  PV|VG|UUID|COUNT" of pvs. Returns 0; -1, silently and with the record untouched, when it is none. */
+TAVO_API int LVMPvParseLine(const char *szLine, LVMPV *pPv);
+
+/* Appends a copy of the record. Returns 0 or -1. */
+TAVO_API int LVMPvSBListPush(LVMPVLIST **ppList, const LVMPV *pPv);
+TAVO_API void LVMPvSBListFree(LVMPVLIST *pList);
+
+/* Has the system look for physical volumes anew. Returns 0 or -1. */
+TAVO_API int LVMPvScan(void);
+
+/* Makes a device no physical volume any more, whatever it belongs to. Returns 0 or -1. */
+TAVO_API int LVMPvRemove(const char *szDevice);
+
+/* --- volume groups --- */
+
+/* Makes a group of physical volumes. A first failure is tried again. Returns 0 or -1. */
+TAVO_API int LVMVgCreate(const char *szVg, const TLIBSZLIST *pslDevices);
+
+/* Removes a group, and its directory in /dev. Returns 0 or -1. */
+TAVO_API int LVMVgRemove(const char *szVg);
+
+/* Renames a group, given by its path, or when that is NULL by its name. Returns 0 or -1. */
+TAVO_API int LVMVgRename(const char *szVg, const char *szOldName, const char *szNewName);
+
+/* Reads a group: 1; 0 when there is none; -1. The record is only written with 1. */
+TAVO_API int LVMVgSBGet(const char *szVg, LVMVG *pVg);
+
+/* An empty record for LVMVgInfoFree; NULL with ERR_OUT_OF_MEMORY. */
+TAVO_API LVMVGINFO *LVMVgInfoAlloc(void);
+TAVO_API void LVMVgInfoFree(LVMVGINFO *pInfo);
+
+/* Fills the record with a group and its physical volumes. Returns 0, or -1 with the record as it was. */
+TAVO_API int LVMVgSB2Info(const LVMVG *pVg, LVMVGINFO *pInfo);
+
+/* Finds the first group that has the key's path, or holds its physical volume: 1 and the record, which stays the list's, in
+ * *ppFound; 0 without one; -1 for a NULL argument (pList may be NULL). */
+TAVO_API int LVMVgSBListSearch(const LVMVGLIST *pList, const LVMVGKEY *pKey, LVMVGINFO **ppFound);
+
+/* --- logical volumes --- */
+
+/* Makes the volume that fills the group. Returns 0 or -1. */
+TAVO_API int LVMLvCreate(const char *szVg, const char *szLv);
+
+/* Makes physical volumes of all devices, in order, a group of them, and its volume. The group's UUID goes into szUuid unless
+ * that is NULL, cut to cbUuid bytes with the final NUL. Returns 0, or -1 at the first failure. */
+TAVO_API int LVMCreate(const TLIBSZLIST *pslDevices, const char *szVg, const char *szLv, char *szUuid, int cbUuid);
+
+/* Gives the path of the first logical volume on a device, "/dev/vg1/lv": 1; 0 when there is none; -1 when szPath is too
+ * small (ERR_NOT_ENOUGH_MEMORY) or an argument is bad. */
+TAVO_API int LVMGetLVPath(const char *szDevice, char *szPath, int cbPath);
+
+/* Removes the logical volume of a device with its mounted snapshots ("lv", "s" and a number), the group and the physical
+ * volume. What fails is logged, and the next step taken. Returns 0; -1 for a bad argument. */
+TAVO_API int LVMRemoveLV(const char *szDevice);
+
+/* Removes the logical volumes of a group. szKind is "lv". Returns 0 or -1. */
+TAVO_API int LVMRemove(const char *szVg, const char *szKind);
+
+/* Removes every physical volume on a disk or a partition ("/dev/sd"): the appliance has them on arrays alone. One that is
+ * mounted or otherwise in use is left, and logged. Does nothing on a model without LVM. Returns 0, or -1 when the physical
+ * volumes cannot be listed. */
+TAVO_API int LVMCleanIllegal(void);
+
+TAVO_END_DECLS
+
+#endif

@@ -1,0 +1,33 @@
+// What the md driver says about an open array and its members.
+#ifndef TAVO_STORAGE_DETAIL_ARRAY_MEMBERS_H
+#define TAVO_STORAGE_DETAIL_ARRAY_MEMBERS_H
+
+#include "tavo_raid.h"
+
+#include <cstdint>
+
+#include <linux/major.h>
+#include <linux/raid/md_u.h>
+#include <sys/ioctl.h>
+
+namespace tavo {
+
+// Requests that only the appliance's driver knows. Their numbers hold the sizes of packed arguments.
+inline constexpr unsigned long kStatusRequest = 0x80040961;
+inline constexpr unsigned long kSyncStatusRequest = 0x80140960;
+static_assert(sizeof(RAIDPROGRESS) == 20 && sizeof(int) == 4);
+
+void FreeMembers(RAIDMEMBER *members) noexcept;
+
+// RAID_MEMBER_ of the kernel's state bits.
+int MemberState(int kernel_state, bool has_no_redundancy);
+
+// The members as heap nodes, in the order of the kernel's numbers; false when memory ran out.
+bool ReadMembers(int fd, const mdu_array_info_t &array, bool has_no_redundancy, RAIDMEMBER **members);
+
+// Whether a word of sync_action means that the array's members are not all up to date; a scrub ("check") does not.
+bool IsRebuildAction(const char *action);
+
+}  // namespace tavo
+
+#endif

@@ -1,0 +1,31 @@
+// Makes the logical volume that fills a group.
+#include "tavo_lvm.h"
+
+#include "core/detail/guard.h"
+#include "core/detail/log.h"
+#include "storage/detail/partition_command.h"
+#include "storage/detail/volume_name.h"
+
+#include <cerrno>
+#include <cstring>
+
+#include <sys/stat.h>
+
+extern "C" int LVMLvCreate(const char *szVg, const char *szLv)
+{
+    if (!szVg || !szLv || !tavo::IsGroupPath(szVg) || !tavo::IsVolumeName(szLv)) {
+        LogError("%s:%d Bad parameters");
+        return -1;
+    }
+    return Guard([&] {
+        const auto result = tavo::RunDiskCommand("/sbin/lvcreate %s -n %s -l100%%VG > /dev/null 2>&1", szVg, szLv);
+        if (result.status != 0) {
+            LogError("%s:%d Failed to '%s'", result.command);
+            return -1;
+        }
+        constexpr mode_t mode = 0755;
+        if (::chmod(szVg, mode) != 0)
+            LogError("%s:%d Failed to chmod '%s' to '%X', errno=%s", szVg, mode, std::strerror(errno));
+        return 0;
+    });
+}

@@ -1,0 +1,121 @@
+// Creates an array.
+#include "tavo_appliance.h"
+#include "tavo_raid.h"
+
+#include "core/detail/guard.h"
+#include "core/detail/log.h"
+#include "storage/detail/array_level.h"
+#include "storage/detail/array_name.h"
+#include "storage/detail/partition_command.h"
+
+#include <optional>
+#include <string>
+
+namespace {
+
+constexpr size_t kMostCommand = 511;  // what the appliance's tools take: 512 bytes with the final NUL
+
+struct LevelOption {
+    const char *level;
+    bool spares;  // takes an option for their number
+    const char *layout;
+};
+
+std::optional<LevelOption> OptionOf(int level)
+{
+    switch (level) {
+    case RAID_LEVEL_5:
+        return LevelOption{"5", true, ""};
+    case RAID_LEVEL_1:
+        return LevelOption{"1", true, ""};
+    case RAID_LEVEL_6:
+        return LevelOption{"6", true, ""};
+    case RAID_LEVEL_0:
+        return LevelOption{"0", false, ""};
+    case RAID_LEVEL_LINEAR:
+        return LevelOption{"linear", false, ""};
+    case RAID_LEVEL_10:
+        return LevelOption{"10", false, "-pn2"};  // near layout, two copies
+    default:
+        return std::nullopt;
+    }
+}
+
+bool AreMembersPlain(const TLIBSZLIST &members)
+{
+    for (int i = 0; i < members.nItem; ++i) {
+        if (!tavo::IsMemberPath(members.pszItem[i]))
+            return false;
+    }
+    return true;
+}
+
+std::string MemberArgument(const RAIDREQUEST &request)
+{
+    std::string argument;
+    for (int i = 0; i < request.pslMembers->nItem; ++i)
+        argument.append(" ").append(request.pslMembers->pszItem[i]);
+    const int missing = request.nSlot - (request.pslMembers->nItem - request.nSpare);
+    for (int i = 0; i < missing && argument.size() <= kMostCommand; ++i)
+        argument += " missing";
+    return argument;
+}
+
+std::string SizeOption(const RAIDREQUEST &request)
+{
+    constexpr uint64_t kib = 1024;
+    if (request.cbArray > 0)
+        return "-z " + std::to_string(request.cbArray / kib);
+    const unsigned long limit = RAIDSizeLimitGet();
+    return limit > 0 ? "-z " + std::to_string(limit) : "";
+}
+
+std::string VersionText(const RAIDVERSION *version)
+{
+    return version ? std::to_string(version->nMajor) + "." + std::to_string(version->nMinor) : "1.1";
+}
+
+std::string Command(const RAIDREQUEST &request, const LevelOption &option, const std::string &members)
+{
+    using Piece = tavo::ComposedPiece;
+    const bool clean = request.fSync == 0 && !tavo::HasNoRedundancy(request.fLevel);
+    const std::string spares = option.spares ? "-x" + std::to_string(request.nSpare) : "";
+    const std::string size = SizeOption(request);
+    return *tavo::ShellCommand("/sbin/mdadm -C %s -e %s -amd %s -R -l%s %s -n%d %s %s %s %s > /dev/null 2>&1",
+                               request.szPath, VersionText(request.pVersion), Piece{clean ? "--assume-clean" : ""},
+                               option.level, Piece{request.nSlot == 1 ? "-f" : ""}, request.nSlot, Piece{option.layout},
+                               Piece{spares}, Piece{size}, Piece{members});
+}
+
+}  // namespace
+
+extern "C" int RAIDCreate(const RAIDREQUEST *pRequest)
+{
+    if (!pRequest || !pRequest->szPath || !pRequest->pslMembers || pRequest->nSpare < 0 || pRequest->nSlot < 1 ||
+        !tavo::IsArrayPath(pRequest->szPath) || !AreMembersPlain(*pRequest->pslMembers) ||
+        (pRequest->pVersion && (pRequest->pVersion->nMajor < 0 || pRequest->pVersion->nMinor < 0))) {
+        LogError({"%s:%d Bad parameters", 47});
+        return Fail(ERR_BAD_PARAMETERS, Line{47});
+    }
+    const int listed = pRequest->pslMembers->nItem;
+    if (listed <= pRequest->nSpare || listed - pRequest->nSpare > pRequest->nSlot) {
+        LogError({"%s:%d Bad parameters", 54});
+        return Fail(ERR_BAD_PARAMETERS, Line{54});
+    }
+    return Guard([&] {
+        const std::optional<LevelOption> option = OptionOf(pRequest->fLevel);
+        if (!option) {
+            LogError("%s:%d unknown raid level: %d", pRequest->fLevel);
+            return Fail(ERR_BAD_PARAMETERS);
+        }
+        // A command that is cut could create some other array.
+        const std::string members = MemberArgument(*pRequest);
+        const std::string command = Command(*pRequest, *option, members);
+        if (members.size() > kMostCommand || command.size() > kMostCommand || tavo::RunCommand(command) != 0) {
+            LogError({"%s:%d Failed to do '%s'", 124}, command);
+            return -1;
+        }
+        TAVORAIDMdTuningPerformance(pRequest->szPath);
+        return 0;
+    });
+}

@@ -1,0 +1,22 @@
+// Changes the number of slots of an array.
+#include "tavo_raid.h"
+
+#include "core/detail/guard.h"
+#include "core/detail/log.h"
+#include "storage/detail/array_name.h"
+#include "storage/detail/partition_command.h"
+
+extern "C" int RAIDDevCountChange(const RAIDINFO *pInfo, int nSlot)
+{
+    if (!pInfo || !tavo::IsArrayPath(pInfo->szPath) || nSlot < 1) {
+        LogError("%s:%d Bad parameters");
+        return Fail(ERR_BAD_PARAMETERS);
+    }
+    return Guard([&] {
+        const auto result = tavo::RunDiskCommand("/sbin/mdadm --grow %s -n %d >/dev/null 2>&1\n", pInfo->szPath, nSlot);
+        if (result.status == 0)
+            return 0;
+        LogError("%s:%d Failed to do '%s', err=%d", result.command, result.status);
+        return -1;
+    });
+}

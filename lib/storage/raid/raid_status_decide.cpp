@@ -1,0 +1,29 @@
+// Decides the health of an array.
+#include "tavo_raid.h"
+
+#include "core/detail/log.h"
+#include "storage/detail/array_level.h"
+
+#include <linux/major.h>
+#include <linux/raid/md_u.h>
+
+extern "C" int RAIDStatusDecide(const mdu_array_info_t *pArray, const RAIDMEMBER *pMembers, int *pStatus)
+{
+    if (!pArray || !pStatus)
+        return Fail(ERR_BAD_PARAMETERS);
+    const std::optional<int> level = tavo::LevelOfKernel(pArray->level);
+    if (!level) {
+        LogError("%s:%d unknown raid level: %d", pArray->level);
+        return -1;
+    }
+    const int parity = RAIDParityDiskCount(*level, pArray->raid_disks);
+    const int active = RAIDDiskCount(pMembers, RAID_MEMBER_ACTIVE);
+    const int missing = pArray->raid_disks - active;
+    if (!pMembers || RAIDDiskCount(pMembers, RAID_MEMBER_FATAL) > 0)
+        *pStatus = RAID_STATUS_CRASHED;
+    else if (missing <= 0)
+        *pStatus = RAID_STATUS_NORMAL;
+    else
+        *pStatus = parity >= missing ? RAID_STATUS_DEGRADED : RAID_STATUS_CRASHED;
+    return 0;
+}

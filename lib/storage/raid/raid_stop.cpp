@@ -1,0 +1,22 @@
+// Stops an array.
+#include "tavo_raid.h"
+
+#include "core/detail/guard.h"
+#include "core/detail/log.h"
+#include "storage/detail/array_name.h"
+#include "storage/detail/partition_command.h"
+
+extern "C" int RAIDStop(const char *szPath)
+{
+    if (!tavo::IsArrayPath(szPath)) {
+        LogError("%s:%d Bad parameters");
+        return Fail(ERR_BAD_PARAMETERS);
+    }
+    return Guard([&] {
+        const auto result = tavo::RunDiskCommand("/sbin/mdadm -S %s > /dev/null 2>&1", szPath);
+        if (result.status == 0)
+            return 0;
+        LogError("%s:%d Failed to do '%s', err=%d", result.command, result.status);
+        return -1;
+    });
+}
