@@ -141,9 +141,10 @@ bool DeviceTree::IsDisk(ino_t inode, dev_t &number) const
 using test::current;
 using test::Real;
 
+// Weak, because a test program may stand in for one of them itself.
 extern "C" {
 
-int open(const char *path, int flags, ...)
+[[gnu::weak]] int open(const char *path, int flags, ...)
 {
     va_list args;
     va_start(args, flags);
@@ -157,7 +158,7 @@ int open(const char *path, int flags, ...)
     return real(current->Place(path, room), flags, mode);
 }
 
-ssize_t readlink(const char *path, char *buffer, size_t size)
+[[gnu::weak]] ssize_t readlink(const char *path, char *buffer, size_t size)
 {
     const auto real = Real<ssize_t(const char *, char *, size_t)>("readlink");
     if (!current || !current->Redirects(path))
@@ -171,7 +172,7 @@ ssize_t __readlink_chk(const char *path, char *buffer, size_t size, size_t)
     return readlink(path, buffer, size);
 }
 
-int fstat(int fd, struct stat *facts)
+[[gnu::weak]] int fstat(int fd, struct stat *facts)
 {
     const int result = Real<int(int, struct stat *)>(test::kFstat)(fd, facts);
     if (dev_t number; result == 0 && current && current->IsDisk(facts->st_ino, number)) {
@@ -181,7 +182,7 @@ int fstat(int fd, struct stat *facts)
     return result;
 }
 
-int glob(const char *pattern, int flags, int (*on_error)(const char *, int), glob_t *found)
+[[gnu::weak]] int glob(const char *pattern, int flags, int (*on_error)(const char *, int), glob_t *found)
 {
     const auto real = Real<int(const char *, int, int (*)(const char *, int), glob_t *)>(test::kGlob);
     const bool redirected = current && current->Redirects(pattern);

@@ -14,6 +14,8 @@ using test::ForgetFault;
 using test::LastFault;
 using testing::ElementsAre;
 
+using namespace std::string_literals;
+
 namespace {
 
 class KeyValueTest : public testing::Test {
@@ -115,7 +117,7 @@ TEST_F(KeyValueTest, SetReplacesTheFirstAndDropsTheRest)
 
 TEST_F(KeyValueTest, SetKeepsTheBytesOfOtherLines)
 {
-    const std::string before("a\0b=c\n\xFF\xFE\nkey=1\n\0\0tail", 23);
+    const std::string before = "a\0b=c\n\xFF\xFE\nkey=1\n\0\0tail"s;
     Write(before);
     EXPECT_EQ(TLIBFileSetKeyValue(file_.c_str(), "key", "2", nullptr), 1);
     std::string after = before;
