@@ -52,6 +52,13 @@ void RecordedCommands::Clear()
     log_->used = 0;
 }
 
+int RecordedCommands::Reply(const char *command) const
+{
+    const CommandReply reply = answer_ ? answer_(command) : CommandReply{};
+    const ssize_t written = ::write(STDOUT_FILENO, reply.output.data(), reply.output.size());
+    return written == static_cast<ssize_t>(reply.output.size()) ? reply.status : 126;
+}
+
 void RecordedCommands::Run(const char *command)
 {
     const size_t length = std::strlen(command) + 1;
@@ -59,11 +66,9 @@ void RecordedCommands::Run(const char *command)
         std::memcpy(log_->text + log_->used, command, length);
         log_->used += length;
     }
-    const CommandReply reply = answer_ ? answer_(command) : CommandReply{};
-    const bool written =
-        ::write(STDOUT_FILENO, reply.output.data(), reply.output.size()) == static_cast<ssize_t>(reply.output.size());
-    // Not _exit, where the sanitizer would look for leaks: the child shares the parent's memory in the middle of a call.
-    ::syscall(SYS_exit_group, written ? reply.status : 126);
+    // The child may share the parent's memory: what it allocates is freed before it goes, and it goes without the look
+    // for leaks that a sanitizer puts into _exit.
+    ::syscall(SYS_exit_group, Reply(command));
     __builtin_unreachable();
 }
 

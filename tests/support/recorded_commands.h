@@ -31,6 +31,8 @@ class RecordedCommands {
     [[noreturn]] void Run(const char *command);
 
   private:
+    int Reply(const char *command) const;
+
     struct Log;
 
     Answer answer_;
