@@ -1,17 +1,191 @@
 /*
  * Local groups.
+ *
+ * The groups live in the account cache database (tavo_bdb.h). After every change the two files that the rest of the
+ * system reads are written anew from it, each by a temporary file and a rename:
+ *   /etc/group, /etc/group_desc
+ * When one of them has been edited by somebody else, or the database is missing or damaged, the next call builds the
+ * database from the files first. docs/accounts.md tells what happens in which order.
+ *
+ * Group names are compared without regard to case; the case that was typed is kept. A name that holds a backslash
+ * ("DOMAIN\group") is a domain group: it shares the record but is never written to the local files, and on an appliance
+ * without a domain none is ever found. Everybody is a member of "users", so its members are never stored.
+ *
+ * Changing needs root. TAVOGroupSet holds the password, group and Samba locks exclusively (tavo_lock.h), TAVOGroupDelete
+ * the group and Samba locks, TAVOGroupDescSet and TAVOUserModifyGroup the group lock, each also the system's own lock on
+ * the account files (lckpwdf); reading holds the group lock shared. Each waits at most 5 seconds. Who takes locks of
+ * its own takes the password lock before the group lock and that before the Samba lock.
+ *
+ * Unless said otherwise a function returns 0 or a count, or -1 with the code set. Any of them may fail with
+ *   ERR_OUT_OF_MEMORY  no memory
+ *   ERR_LOCK_FAILED    a lock was not free within 5 seconds
+ *   ERR_OPEN_FAILED    the account cache database cannot be opened or rebuilt
+ * and then nothing has changed.
  */
 #ifndef TAVO_GROUP_H
 #define TAVO_GROUP_H
 
+#include "tavo_bdb.h"
 #include "tavo_error.h"
 #include "tavo_hash.h"
+#include "tavo_list.h"
 
 TAVO_BEGIN_DECLS
 
+/* What TAVOGroupEnum lists. */
+enum {
+    TAVO_GROUP_LOCAL = 0x1, /* local groups */
+    TAVO_GROUP_DOMAIN = 0x2 /* domain groups */
+};
+
+/* The kinds of groups. */
+enum {
+    TAVO_GROUP_KIND_NONE = 0,  /* no name */
+    TAVO_GROUP_KIND_LOCAL = 1, /* a local group */
+    TAVO_GROUP_KIND_DOMAIN = 2 /* a domain group: its name holds a backslash */
+};
+
+/* The group ids that the library chooses. */
+enum { TAVO_GROUP_GID_MIN = 65536, TAVO_GROUP_GID_MAX = 95536 };
+
+/* One group. A single block: release it with TAVOGroupFree only. */
+typedef struct TAVOGROUP {
+    char *szName;      /* as it was typed */
+    int32_t nGid;      /* -1 when handed in: choose one (add), keep it (change) */
+    char **rgszMember; /* names of users, NULL at the end; when handed in NULL means none */
+    int32_t nKind;     /* one of TAVO_GROUP_KIND_ */
+    int32_t cbBlock;   /* bytes of the whole block */
+} TAVOGROUP;
+
+/* The three stores of the group database, each open. Open them with TAVOBDbOpen under the group lock, after a reading
+ * call of this family has brought them up to date; close them with TAVOBDbClose. */
+typedef struct TAVOGROUPDB {
+    TAVOBDB *pName;
+    TAVOBDB *pGid;
+    TAVOBDB *pDesc;
+} TAVOGROUPDB;
+
+/*
+ * Records.
+ */
+
+/* Fills a record from a line of /etc/group, which must have four fields. *ppGroup is NULL, or a record to be refilled,
+ * which may move. Release the record with TAVOGroupFree.
+ * Fails, the record untouched, with
+ *   ERR_BAD_PARAMETERS     an argument is NULL
+ *   ERR_FORMAT_ERROR       the line has not four fields, or the third is no number
+ *   ERR_INVALID_GROUPNAME  the name is empty */
+TAVO_API int TAVOGroupAlloc(TAVOGROUP **ppGroup, const char *szLine);
+
+/* Fills a record from a name, a group id and an array of member names with NULL at its end (NULL: none). Members called
+ * "nobody" and empty ones are left out. As TAVOGroupAlloc; arguments may point into the old record. Fails with
+ * ERR_BAD_PARAMETERS (ppGroup NULL, szName NULL or empty). */
+TAVO_API int TAVOGroupAlloc2(TAVOGROUP **ppGroup, const char *szName, int gid, const char *const *rgszMember);
+
+/* Releases a record; NULL is allowed. */
+TAVO_API void TAVOGroupFree(TAVOGROUP *pGroup);
+
+/*
+ * Reading.
+ */
+
+/* 1 when a new group may have this name, else 0: 1 to 15 characters, ASCII letters, digits, ".", "-", "_", blanks and
+ * everything beyond ASCII; neither "-" nor a blank at the beginning, no blank at the end. */
+TAVO_API int BlTLIBIsGroupName(const char *szName);
+
+/* Reads one group by name (any case) or by group id into *ppGroup: NULL, or a record to be refilled. The caller
+ * releases it with TAVOGroupFree.
+ * Fails, *ppGroup untouched, with
+ *   ERR_BAD_PARAMETERS     ppGroup is NULL, or the name NULL or empty
+ *   ERR_NO_SUCH_GROUP      there is no such group
+ *   ERR_INVALID_GROUPNAME  the name cannot be converted, or the stored line has an empty one
+ *   ERR_FORMAT_ERROR       the stored line has the wrong number of fields */
+TAVO_API int TAVOGroupGet(const char *szName, TAVOGROUP **ppGroup);
+TAVO_API int TAVOGroupGetByGID(int gid, TAVOGROUP **ppGroup);
+
+/* Appends the names of the groups that `flags` (TAVO_GROUP_) select, in the order of their upper-case names, and returns
+ * how many. Local groups with ids below 65536 belong to the system and are not listed, except "users". The list may
+ * move: *ppList is updated, also when the call fails half-way.
+ * ByPrefix and BySubstr list only names that begin with, or hold, szText, without regard to case; "" selects all.
+ * Fails with
+ *   ERR_BAD_PARAMETERS  ppList, *ppList or szText is NULL, or no flag is set
+ *   ERR_ENUM_FAILED     the database cannot be walked */
+TAVO_API int TAVOGroupEnum(TLIBSZLIST **ppList, int flags);
+TAVO_API int TAVOGroupEnumByPrefix(TLIBSZLIST **ppList, int flags, const char *szText);
+TAVO_API int TAVOGroupEnumBySubstr(TLIBSZLIST **ppList, int flags, const char *szText);
+
+/* The number of names that TAVOGroupEnum would append. Fails as it does. */
+TAVO_API int TAVOGroupTotalNum(int flags);
+
+/* Appends the members of a group that are existing users, in their stored order, and returns how many; for "users" (any
+ * case) every local user that TAVOUserEnum lists. Fails as TAVOGroupGet and TAVOUserEnum. */
+TAVO_API int TAVOGroupListMember(const char *szName, TLIBSZLIST **ppList);
+
+/* Copies the description of a group into szBuf of cbBuf bytes: "" when it has none. Returns its length with the NUL;
+ * szBuf NULL with cbBuf 0 asks for that.
+ * Fails with
+ *   ERR_BAD_PARAMETERS     the name is NULL or empty, or the buffer none
+ *   ERR_NO_SUCH_GROUP      there is no such group
+ *   ERR_INVALID_GROUPNAME  the name cannot be converted
+ *   ERR_NOT_ENOUGH_MEMORY  the buffer is too small */
+TAVO_API int TAVOGroupDescGet(const char *szName, char *szBuf, int cbBuf);
+
+/*
+ * Changing.
+ *
+ * When the files cannot be written these functions fail with ERR_OPEN_FAILED, ERR_WRITE_FAILED, ERR_NOT_ENOUGH_SPACE
+ * or ERR_RENAME_FAILED; the files are the old ones, and the next call goes back to them. ERR_UNLOCK_FAILED means that
+ * all was done but the locks could not be given back.
+ */
+
+/* Adds a group (szOldName NULL) or changes the one called szOldName, also its name. The description of a renamed group
+ * goes with it, and so do its places in the privilege lists of the shared folders and in Samba's settings; a failure
+ * there is logged only.
+ * Fails, nothing changed, in this order with
+ *   ERR_BAD_PARAMETERS     pGroup or its name is NULL
+ *   ERR_TOO_MANY_GROUPS    no group id is free (add, id -1)
+ *   ERR_NO_SUCH_GROUP      there is no group szOldName
+ *   ERR_GROUP_EXISTS       there is a group of the new name
+ *   ERR_INVALID_GROUPNAME  the new name is not acceptable, is "." or "..", or belongs to a domain
+ *   ERR_BAD_PARAMETERS     an id below -1; a member with a comma, a colon or a control character, or of more than 512
+ *                          bytes */
+TAVO_API int TAVOGroupSet(const char *szOldName, const TAVOGROUP *pGroup);
+
+/* Deletes groups, "system" ones too: there is no protected name. Domain groups are skipped; a group that does not exist
+ * or cannot be deleted is logged, its code stays in the error state, and the others are deleted all the same. The
+ * groups also leave the privilege lists of the shared folders and Samba's settings; a failure there is logged only.
+ * Returns 0 also when none was deleted. Fails with ERR_BAD_PARAMETERS (rgszName NULL with nGroup not 0, or nGroup
+ * negative). */
+TAVO_API int TAVOGroupDelete(const char *const *rgszName, int nGroup);
+
+/* Sets the description of a group; NULL or "" deletes it.
+ * Fails with
+ *   ERR_BAD_PARAMETERS     the name is NULL or empty, or the description holds a colon or a control character or has
+ *                          more than 512 bytes
+ *   ERR_NO_SUCH_GROUP      there is no such group
+ *   ERR_INVALID_GROUPNAME  the name cannot be converted */
+TAVO_API int TAVOGroupDescSet(const char *szName, const char *szDesc);
+
 /* Applies renames and deletions of users to the member lists of all groups: pshNames maps upper-case old names to new
- * names, "" for a deleted user. Returns 0 or -1. */
+ * names, "" for a deleted user. The files are rewritten once, and only when a list has changed.
+ * Fails with ERR_BAD_PARAMETERS (pshNames NULL). */
 TAVO_API int TAVOUserModifyGroup(const TLIBSZHASH *pshNames);
+
+/*
+ * The open database, for programs that hold the group lock exclusively.
+ */
+
+/* The next free group id, from 65536 to 95536 and round again, behind the one that was handed out last.
+ * Fails with
+ *   ERR_BAD_PARAMETERS   pDb or its store pGid is NULL
+ *   ERR_TOO_MANY_GROUPS  all are taken
+ *   ERR_DB_CURSOR        the store cannot be read */
+TAVO_API int TAVOGroupDBGetFreeGid(TAVOGROUPDB *pDb);
+
+/* Stores one group; szOldName as in TAVOGroupSet. Neither the files nor the id handed out last are touched. Fails as
+ * TAVOGroupSet does, with the codes of TAVOBDbSet, and with ERR_GROUP_DB_DELETE when the old entries cannot be deleted.
+ */
+TAVO_API int TAVOGroupDBSet(TAVOGROUPDB *pDb, const char *szOldName, const TAVOGROUP *pGroup);
 
 TAVO_END_DECLS
 

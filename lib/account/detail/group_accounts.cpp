@@ -1,0 +1,154 @@
+// Reads, stores and removes one group in the open stores of the group family.
+#include "account/detail/group_accounts.h"
+
+#include "account/detail/account_name.h"
+#include "account/detail/account_session.h"
+#include "account/detail/colon_fields.h"
+#include "account/detail/group_texts.h"
+
+namespace tavo {
+namespace {
+
+// Programs read these lines with buffers of a fixed size.
+constexpr size_t kLongestField = 512;
+
+std::string WithNul(std::string_view line)
+{
+    return std::string(line).append(1, '\0');
+}
+
+bool HasIndex(const TAVOGROUPDB &db, int32_t gid, std::string_view key)
+{
+    std::string_view owner;
+    return Btree::Of(db.pGid)->Get(IdKey(gid), owner) == 0 && owner == key;
+}
+
+bool FitsInMembers(std::string_view name)
+{
+    return name.size() <= kLongestField && FitsInField(name, true) && name.find(',') == name.npos && !IsDotName(name);
+}
+
+int TakeMembers(const TAVOGROUP &group, GroupChange &change)
+{
+    for (char *const *member = group.rgszMember; member && *member; ++member) {
+        if (!FitsInMembers(*member))
+            return ERR_BAD_PARAMETERS;
+        if (IsMember(*member) && !IsEverybody(change.key))
+            change.line.members.emplace_back(*member);
+    }
+    return 0;
+}
+
+int FindOld(const TAVOGROUPDB &db, const char *old_name, GroupChange &change)
+{
+    const std::optional<std::string> key = AccountKey(old_name, kGroupKeySize);
+    if (!key)
+        return ERR_NO_SUCH_GROUP;
+    GroupLine old;
+    if (const int code = ReadGroupLine(db, *key, old))
+        return code;
+    change.old_key = *key;
+    change.old_name = old.name;
+    change.old_gid = old.gid;
+    return 0;
+}
+
+}  // namespace
+
+TAVOGROUPDB GroupDb(const AccountSession &session)
+{
+    return {session.Store(kGroupNameStore), session.Store(kGidStore), session.Store(kDescStore)};
+}
+
+int ReadGroupLine(const TAVOGROUPDB &db, std::string_view key, GroupLine &line)
+{
+    std::string_view value;
+    const int code = Btree::Of(db.pName)->Get(key, value);
+    if (code != 0)
+        return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_GROUP} : code;
+    return ParseGroupLine(value, line);
+}
+
+int FindGroupKey(const TAVOGROUPDB &db, int32_t gid, std::string &key)
+{
+    std::string_view owner;
+    GroupLine line;
+    if (Btree::Of(db.pGid)->Get(IdKey(gid), owner) == 0 && ReadGroupLine(db, owner, line) == 0 && line.gid == gid) {
+        key = owner;
+        return 0;
+    }
+    // It may share its id with another group, which has the index entry, or have lost it with that one.
+    Btree &names = *Btree::Of(db.pName);
+    std::string_view name;
+    std::string_view value;
+    int code;
+    for (names.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = names.Step(true, name, value)) == 0;
+         names.nCursorType = TAVO_BDB_CURSOR_NEXT) {
+        if (ParseGroupLine(value, line) == 0 && line.gid == gid) {
+            key = name;
+            return 0;
+        }
+    }
+    return code == ERR_DB_END ? int{ERR_NO_SUCH_GROUP} : code;
+}
+
+bool IsGroupDescription(std::string_view text)
+{
+    return text.size() <= kLongestField && FitsInField(text, true);
+}
+
+int PrepareGroup(const TAVOGROUPDB &db, const char *old_name, const TAVOGROUP &group, int32_t gid, GroupChange &change)
+{
+    change = {};
+    const std::optional<std::string> key = AccountKey(group.szName, kGroupKeySize);
+    if (!key)
+        return ERR_INVALID_GROUPNAME;
+    change.key = *key;
+    if (old_name)
+        if (const int code = FindOld(db, old_name, change))
+            return code;
+    std::string_view taken;
+    if (change.old_key != change.key && Btree::Of(db.pName)->Get(change.key, taken) == 0)
+        return ERR_GROUP_EXISTS;
+    if (!IsAccountName(group.szName, kGroupNameChars) || IsDotName(group.szName))
+        return ERR_INVALID_GROUPNAME;
+    change.line.name = group.szName;
+    change.line.gid = old_name && gid == -1 ? change.old_gid : gid;
+    if (change.line.gid < 0 && change.line.gid != change.old_gid)
+        return ERR_BAD_PARAMETERS;
+    return TakeMembers(group, change);
+}
+
+int StoreGroup(const TAVOGROUPDB &db, const GroupChange &change)
+{
+    std::string description;
+    std::string_view line;
+    if (!change.old_key.empty()) {
+        if (Btree::Of(db.pDesc)->Get(change.old_key, line) == 0)
+            description = GroupDescription(line);
+        // The entries of a group that keeps its key are overwritten anyway.
+        const bool overwritten = change.old_key == change.key && !IsEverybody(change.key);
+        if (const int code = RemoveGroup(db, change.old_key, change.old_gid); code != 0 && !overwritten)
+            return code;
+    }
+    int code = Btree::Of(db.pName)->Set(change.key, WithNul(FormatGroupLine(change.line)));
+    std::string_view other;
+    if (code == 0 && Btree::Of(db.pGid)->Get(IdKey(change.line.gid), other) != 0)
+        code = Btree::Of(db.pGid)->Set(IdKey(change.line.gid), change.key);
+    if (code == 0 && !description.empty())
+        code = Btree::Of(db.pDesc)->Set(change.key, WithNul(FormatGroupDescLine(change.line.name, description)));
+    return code;
+}
+
+int RemoveGroup(const TAVOGROUPDB &db, const std::string &key, int32_t gid)
+{
+    const bool indexed = HasIndex(db, gid, key);
+    const int codes[] = {Btree::Of(db.pName)->Delete(key), Btree::Of(db.pDesc)->Delete(key),
+                         indexed ? Btree::Of(db.pGid)->Delete(IdKey(gid)) : 0};
+    for (const int code : codes)
+        if (code != 0 && code != ERR_KEY_NOT_FOUND)
+            return ERR_GROUP_DB_DELETE;
+    return 0;
+}
+
+}  // namespace tavo

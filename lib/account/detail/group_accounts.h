@@ -1,0 +1,47 @@
+// Reads, writes and removes one group in the open stores of the group family. Codes come back; nothing is logged.
+#ifndef TAVO_ACCOUNT_DETAIL_GROUP_ACCOUNTS_H
+#define TAVO_ACCOUNT_DETAIL_GROUP_ACCOUNTS_H
+
+#include "account/detail/group_line.h"
+#include "account/detail/id_index.h"
+#include "tavo_group.h"
+
+namespace tavo {
+
+class AccountSession;
+
+inline constexpr IdRange kGids{kCurrentGidKey, TAVO_GROUP_GID_MIN, TAVO_GROUP_GID_MAX, ERR_TOO_MANY_GROUPS};
+
+// The stores of a session as the functions here, and callers, know them.
+TAVOGROUPDB GroupDb(const AccountSession &session);
+
+// ERR_NO_SUCH_GROUP; ERR_FORMAT_ERROR, ERR_INVALID_GROUPNAME, ERR_DB_CURSOR ...
+int ReadGroupLine(const TAVOGROUPDB &db, std::string_view key, GroupLine &line);
+
+// The key of the group with this id: ERR_NO_SUCH_GROUP when there is none.
+int FindGroupKey(const TAVOGROUPDB &db, int32_t gid, std::string &key);
+
+// A description that fits into its line. "" takes the description away.
+bool IsGroupDescription(std::string_view text);
+
+// What is about to be stored for one group, complete: storing it cannot be refused any more.
+struct GroupChange {
+    std::string old_key;   // of the group that is replaced; empty when one is added
+    std::string old_name;  // as it stood
+    int32_t old_gid = -1;
+    std::string key;
+    GroupLine line;
+};
+
+// Refuses with one of the codes of TAVOGroupDBSet; changes nothing. `gid` -1 keeps that of the old group.
+int PrepareGroup(const TAVOGROUPDB &db, const char *old_name, const TAVOGROUP &group, int32_t gid, GroupChange &change);
+
+// Fails only when a store cannot be changed; then the stores are no longer to be trusted.
+int StoreGroup(const TAVOGROUPDB &db, const GroupChange &change);
+
+// ERR_GROUP_DB_DELETE when a store cannot be changed. What is not there needs no deleting.
+int RemoveGroup(const TAVOGROUPDB &db, const std::string &key, int32_t gid);
+
+}  // namespace tavo
+
+#endif

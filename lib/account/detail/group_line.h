@@ -1,0 +1,35 @@
+// A line of /etc/group, and one of /etc/group_desc.
+#ifndef TAVO_ACCOUNT_DETAIL_GROUP_LINE_H
+#define TAVO_ACCOUNT_DETAIL_GROUP_LINE_H
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace tavo {
+
+struct GroupLine {
+    std::string name;
+    int32_t gid = -1;
+    std::vector<std::string> members;
+};
+
+// 0, ERR_FORMAT_ERROR when there are not four fields with a number, ERR_INVALID_GROUPNAME when the name is empty.
+// Members that are no members of anything are left out: see IsMember.
+int ParseGroupLine(std::string_view text, GroupLine &line);
+
+std::string FormatGroupLine(const GroupLine &line);
+
+std::string FormatGroupDescLine(std::string_view name, std::string_view description);
+std::string_view GroupDescription(std::string_view line);
+
+// "nobody" is the user of those who are nobody, so it belongs to no group; empty names come from stray commas.
+bool IsMember(std::string_view name);
+
+// Everybody is in "users", so nobody is listed there.
+bool IsEverybody(std::string_view group_key);
+
+}  // namespace tavo
+
+#endif

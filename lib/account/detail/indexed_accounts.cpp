@@ -1,0 +1,82 @@
+// Collects the accounts of open stores in the order of their ids.
+#include "account/detail/indexed_accounts.h"
+
+#include "account/detail/account_name.h"
+#include "account/detail/store_content.h"
+#include "core/detail/text_fields.h"
+
+#include <algorithm>
+
+namespace tavo {
+namespace {
+
+int AddAccount(std::string_view key, std::string_view value, const AccountLines &lines, AccountKeys &seen,
+               std::vector<IndexedAccount> &accounts)
+{
+    std::string name;
+    int32_t id = -1;
+    const std::string_view text = LineOf(value);
+    if (!IsOneLine(text) || lines.parse(text, name, id) != 0)
+        return ERR_FORMAT_ERROR;
+    if (seen.emplace(key).second && !IsDomainName(name))
+        accounts.push_back({std::string(key), name, static_cast<uint32_t>(id), std::string(text)});
+    return 0;
+}
+
+}  // namespace
+
+std::string_view LineOf(std::string_view value)
+{
+    return value.substr(0, value.find('\0'));
+}
+
+bool IsOneLine(std::string_view line)
+{
+    return line.find('\n') == line.npos;
+}
+
+// By the index first and then those that it does not name: accounts that share an id with another one.
+int CollectAccounts(Btree &index, Btree &names, const AccountLines &lines, AccountKeys &keys,
+                    std::vector<IndexedAccount> &accounts)
+{
+    std::string_view key;
+    std::string_view value;
+    int code;
+    for (index.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = index.Step(true, key, value)) == 0;
+         index.nCursorType = TAVO_BDB_CURSOR_NEXT) {
+        std::string_view line;
+        if (names.Get(value, line) == 0 && (code = AddAccount(value, line, lines, keys, accounts)) != 0)
+            return code;
+    }
+    if (code != ERR_DB_END)
+        return code;
+    for (names.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = names.Step(true, key, value)) == 0;
+         names.nCursorType = TAVO_BDB_CURSOR_NEXT)
+        if ((code = AddAccount(key, value, lines, keys, accounts)) != 0)
+            return code;
+    std::stable_sort(accounts.begin(), accounts.end(),
+                     [](const IndexedAccount &left, const IndexedAccount &right) { return left.id < right.id; });
+    return code == ERR_DB_END ? 0 : code;
+}
+
+std::string AccountThatWouldBeLost(const Btree &names, const AccountLines &lines, const AccountKeys &kept)
+{
+    std::string text;
+    int64_t ignored = 0;
+    if (!ReadTextFile(lines.path, text, ignored))
+        return "?";
+    for (std::string_view rest = text; !rest.empty();) {
+        std::string name;
+        int32_t id = -1;
+        const std::string_view whole = TakeLine(rest);
+        if (whole.find('\0') != whole.npos || lines.parse(whole, name, id) != 0 || IsDomainName(name))
+            continue;
+        const std::string as_it_stands = name + '\0';
+        const std::string key = AccountKey(name, lines.key_size).value_or(as_it_stands);
+        if (!kept.contains(key) && !kept.contains(as_it_stands) && !names.Deleted().contains(key))
+            return name;
+    }
+    return {};
+}
+
+}  // namespace tavo

@@ -1,0 +1,44 @@
+// The accounts of open stores in the order of their ids, as the text files list them. Users and groups alike.
+#ifndef TAVO_ACCOUNT_DETAIL_INDEXED_ACCOUNTS_H
+#define TAVO_ACCOUNT_DETAIL_INDEXED_ACCOUNTS_H
+
+#include "account/detail/btree.h"
+
+#include <cstdint>
+#include <vector>
+
+namespace tavo {
+
+struct IndexedAccount {
+    std::string key;
+    std::string name;
+    uint32_t id;
+    std::string line;  // of the file that says which accounts there are
+};
+
+// How the lines of a family are read: name and id, or an error code.
+struct AccountLines {
+    int (*parse)(std::string_view line, std::string &name, int32_t &id);
+    const char *path;  // the text file that they stand in
+    size_t key_size;
+};
+
+using AccountKeys = std::set<std::string, std::less<>>;
+
+// The text of a stored value, without its NUL.
+std::string_view LineOf(std::string_view value);
+
+// A line end inside a line would make an account of its own of what follows it.
+bool IsOneLine(std::string_view line);
+
+// Every account, those that share an id with another one too. ERR_FORMAT_ERROR when a store holds what is none.
+int CollectAccounts(Btree &index, Btree &names, const AccountLines &lines, AccountKeys &keys,
+                    std::vector<IndexedAccount> &accounts);
+
+// The files are written whole, so an account that the stores do not know would be gone without anybody having deleted
+// it. Its name; empty when there is none.
+std::string AccountThatWouldBeLost(const Btree &names, const AccountLines &lines, const AccountKeys &kept);
+
+}  // namespace tavo
+
+#endif

@@ -1,0 +1,27 @@
+// Runs one of the quota tools on a volume.
+#ifndef TAVO_ACCOUNT_DETAIL_QUOTA_COMMAND_H
+#define TAVO_ACCOUNT_DETAIL_QUOTA_COMMAND_H
+
+#include "account/detail/quota_volumes.h"
+#include "core/detail/run_command.h"
+#include "core/detail/shell_command.h"
+#include "tavo_error.h"
+
+namespace tavo {
+
+struct QuotaCommand {
+    const char *format;  // volume path and number
+    int failure;         // the code when the tool fails
+};
+
+// 0, the command's code, or ERR_QUOTA_SHELL when it could not be run.
+inline int RunQuotaCommand(const QuotaCommand &command, int volume)
+{
+    const std::optional<std::string> text = ShellCommand(command.format, kVolume, volume);
+    const int status = text ? RunCommand(*text) : -1;
+    return status == 0 ? 0 : status < 0 ? int{ERR_QUOTA_SHELL} : command.failure;
+}
+
+}  // namespace tavo
+
+#endif

@@ -1,0 +1,35 @@
+// Sets or deletes the description of a group.
+#include "tavo_group.h"
+
+#include "account/detail/account_name.h"
+#include "account/detail/group_commit.h"
+#include "account/detail/group_texts.h"
+#include "core/detail/guard.h"
+#include "tavo_lock.h"
+
+extern "C" int TAVOGroupDescSet(const char *szName, const char *szDesc)
+{
+    const char *text = szDesc ? szDesc : "";
+    if (!szName || !*szName || !tavo::IsGroupDescription(text))
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        const std::optional<std::string> key = tavo::AccountKey(szName, tavo::kGroupKeySize);
+        if (!key)
+            return Fail(ERR_INVALID_GROUPNAME);
+        tavo::AccountSession session(tavo::kGroupKind);
+        if (const int code = session.OpenToChange(TAVO_LOCK_GROUP))
+            return Fail(code);
+        tavo::GroupLine group;
+        if (const int code = tavo::ReadGroupLine(tavo::GroupDb(session), *key, group))
+            return Fail(code);
+        session.BeginChange();
+        tavo::Btree &descriptions = *session.Store(tavo::kDescStore);
+        int code = *text ? descriptions.Set(*key, tavo::FormatGroupDescLine(group.name, text).append(1, '\0'))
+                         : descriptions.Delete(*key);
+        if (code == 0 || (code == ERR_KEY_NOT_FOUND && !*text))
+            code = tavo::CommitGroups(session);
+        if (code != 0)
+            return Fail(code);
+        return session.Unlock() ? 0 : Fail(ERR_UNLOCK_FAILED);
+    });
+}

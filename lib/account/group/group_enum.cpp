@@ -1,0 +1,18 @@
+// Lists the groups.
+#include "tavo_group.h"
+
+#include "account/detail/group_enum.h"
+#include "core/detail/guard.h"
+
+extern "C" int TAVOGroupEnum(TLIBSZLIST **ppList, int flags)
+{
+    if (!ppList || !*ppList)
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        std::vector<std::string> names;
+        if (const int code = tavo::ListGroups(
+                flags, [](std::string_view) { return true; }, names))
+            return Fail(code);
+        return tavo::PushNames(ppList, names) ? static_cast<int>(names.size()) : Fail(ERR_OUT_OF_MEMORY);
+    });
+}

@@ -1,0 +1,21 @@
+// Lists the groups whose name holds a text.
+#include "tavo_group.h"
+
+#include "account/detail/group_enum.h"
+#include "core/detail/guard.h"
+
+extern "C" int TAVOGroupEnumBySubstr(TLIBSZLIST **ppList, int flags, const char *szText)
+{
+    if (!ppList || !*ppList || !szText)
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        const std::optional<std::string> text = tavo::GroupFilterText(szText);
+        std::vector<std::string> names;
+        const auto wanted = [&](std::string_view key) {
+            return text && key.find(*text) != key.npos;
+        };
+        if (const int code = tavo::ListGroups(flags, wanted, names))
+            return Fail(code);
+        return tavo::PushNames(ppList, names) ? static_cast<int>(names.size()) : Fail(ERR_OUT_OF_MEMORY);
+    });
+}

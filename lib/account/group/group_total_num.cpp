@@ -1,0 +1,16 @@
+// Counts the groups.
+#include "tavo_group.h"
+
+#include "account/detail/group_enum.h"
+#include "core/detail/guard.h"
+
+extern "C" int TAVOGroupTotalNum(int flags)
+{
+    return Guard([&] {
+        std::vector<std::string> names;
+        if (const int code = tavo::ListGroups(
+                flags, [](std::string_view) { return true; }, names))
+            return Fail(code);
+        return static_cast<int>(names.size());
+    });
+}
