@@ -353,12 +353,12 @@ TEST(GroupFollowUp, SharesAndSamba)
     test::WriteFile("/usr/tavo/etc/smb.conf", "[s]\nvalid users = staff, @staff, +Staff\n");
     ASSERT_EQ(AddGroup("staff"), 0);
     EXPECT_EQ(test::ReadFile("/usr/tavo/etc/share.conf"), shares);
-    ASSERT_EQ(SetGroup("STAFF", "the crew"), 0);
+    ASSERT_EQ(SetGroup("STAFF", "crew"), 0);
     EXPECT_EQ(test::ReadFile("/usr/tavo/etc/share.conf"),
-              "# mine\n[photo]\npath=/volume1/@staff\nreadonly=\"@the crew, staff,@STAFF2\"\n"
-              "readwrite = bob , @the crew\ndeny=@the crew\n[x]\ndescription=@staff,a");
-    EXPECT_THAT(test::ReadFile("/usr/tavo/etc/smb.conf"), HasSubstr("the crew"));
-    ASSERT_EQ(DeleteGroups({"the crew"}), 0);
+              "# mine\n[photo]\npath=/volume1/@staff\nreadonly=\"@crew, staff,@STAFF2\"\n"
+              "readwrite = bob , @crew\ndeny=@crew\n[x]\ndescription=@staff,a");
+    EXPECT_THAT(test::ReadFile("/usr/tavo/etc/smb.conf"), HasSubstr("crew"));
+    ASSERT_EQ(DeleteGroups({"crew"}), 0);
     EXPECT_EQ(test::ReadFile("/usr/tavo/etc/share.conf"),
               "# mine\n[photo]\npath=/volume1/@staff\nreadonly=\" staff,@STAFF2\"\n"
               "readwrite = bob \ndeny=\n[x]\ndescription=@staff,a");
