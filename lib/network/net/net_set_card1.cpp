@@ -82,6 +82,14 @@ int UseDhcp(const char *interface)
     return 0;
 }
 
+// Whatever leading zeros the caller wrote.
+template <size_t Size>
+bool Holds(const char (&field)[Size], const tavo::Ipv4 &address)
+{
+    const auto found = tavo::ParseIpv4({field, ::strnlen(field, Size)});
+    return found && found->Word() == address.Word();
+}
+
 // The daemon that tells a name service our address wants to know of a new one.
 void TellDynamicDns()
 {
@@ -122,7 +130,7 @@ int UseStatic(const TAVONETCARD &card, const TAVONETCARD *previous)
     }
     ::unlink("/etc/ppp/old_gateway.bak");
     ::unlink("/etc/resolv.conf.bak");
-    if (!previous || std::strcmp(previous->szIp, card.szIp) != 0 || std::strcmp(previous->szMask, card.szMask) != 0)
+    if (!previous || !Holds(previous->szIp, address) || !Holds(previous->szMask, mask))
         TellDynamicDns();
     return 0;
 }
