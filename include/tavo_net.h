@@ -165,6 +165,20 @@ TAVO_API int TAVOIIpConflict(const char *szInterface, const char *szAddr);
 /* 1 when the cable of the interface has something at its other end, else 0. */
 TAVO_API int BlTLIBIsConnected(const char *szInterface);
 
+/* 1 when a TCP or UDP socket over IPv4 has the local port (1 to 65535; /proc/net/tcp, /proc/net/udp), else 0; also 0 with
+ * ERR_BAD_PARAMETERS or ERR_OPEN_FAILED. */
+TAVO_API int BlTLIBIsPortInUse(int port);
+
+/* Adds or removes the route to a network behind an interface, which may be the dial-up one, ppp0. Return 0, or -1 with
+ * ERR_BAD_PARAMETERS, ERR_INVALID_NETNAME (no address, no contiguous mask, or bits of the address outside of the mask),
+ * ERR_LOCK_FAILED or ERR_OP_FAILURE (the tool failed: there is such a route already, or none to remove). */
+TAVO_API int TAVONetRouteAdd(const char *szNet, const char *szMask, const char *szInterface);
+TAVO_API int TAVONetRouteDel(const char *szNet, const char *szMask, const char *szInterface);
+
+/* Switches IPv6 on an interface on (fEnable not 0) or off, in the kernel alone. Returns 0, or -1 with ERR_BAD_PARAMETERS,
+ * ERR_LOCK_FAILED or ERR_OP_FAILURE (there is no such interface, or the kernel has no IPv6). */
+TAVO_API int TAVONetIPv6Set(const char *szInterface, int fEnable);
+
 /*
  * Link aggregation.
  */

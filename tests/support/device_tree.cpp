@@ -60,7 +60,7 @@ DeviceTree *DeviceTree::Current()
 bool DeviceTree::Redirects(std::string_view path) const
 {
     for (const std::string_view place :
-         {"/dev/sd", "/dev/md", "/sys/", "/proc/partitions", "/proc/mounts", "/etc.defaults/"}) {
+         {"/dev/sd", "/dev/md", "/sys/", "/proc/partitions", "/proc/mounts", "/proc/net/", "/etc.defaults/"}) {
         if (path.starts_with(place))
             return true;
     }

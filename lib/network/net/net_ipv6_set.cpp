@@ -1,0 +1,22 @@
+// Switches IPv6 on an interface on or off.
+#include "tavo_net.h"
+
+#include "core/detail/guard.h"
+#include "core/detail/lock_hold.h"
+#include "network/detail/interface_name.h"
+#include "network/detail/net_command.h"
+#include "network/detail/network_lock.h"
+
+extern "C" int TAVONetIPv6Set(const char *szInterface, int fEnable)
+{
+    if (!szInterface || !tavo::IsInterfaceName(szInterface))
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        const tavo::LockHold lock(tavo::kNetworkExclusive, tavo::kNetworkSeconds);
+        if (!lock)
+            return Fail(ERR_LOCK_FAILED);
+        const int status = tavo::RunNetCommand("/bin/echo %d > %s%s%s", fEnable ? 0 : 1, "/proc/sys/net/ipv6/conf/",
+                                               szInterface, "/disable_ipv6");
+        return status == 0 ? 0 : Fail(ERR_OP_FAILURE);
+    });
+}

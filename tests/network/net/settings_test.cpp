@@ -1,0 +1,562 @@
+// What is run, written and logged when an interface, the gateway, the name servers or the host name change.
+#include "tavo_net.h"
+
+#include "cards.h"
+#include "support/hostile_names.h"
+#include "support/recorded_commands.h"
+
+#include <csignal>
+#include <cstdarg>
+
+#include <dlfcn.h>
+#include <fcntl.h>
+#include <sys/syscall.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+using test::Cards;
+using test::CommandReply;
+using test::LastFault;
+using test::ReadFile;
+using test::WriteFile;
+using testing::AllOf;
+using testing::Each;
+using testing::ElementsAre;
+using testing::EndsWith;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::MatchesRegex;
+
+namespace {
+
+bool unkillable = false;
+std::string named_host;
+
+constexpr const char *kQuiet = " > /dev/null 2>&1";
+
+std::string Quiet(const std::string &command)
+{
+    return command + kQuiet;
+}
+
+class NetSettings : public Cards {
+  protected:
+    NetSettings()
+    {
+        AddCard("eth0", "192.0.2.10");
+        SetRoutes("eth0\t000200C0\t00000000\t0001\t0\t0\t0\t00FFFFFF\t0\t0\t0\n"
+                  "eth0\t00000000\t010200C0\t0003\t0\t0\t0\t00000000\t0\t0\t0\n");
+        WriteFile(kIfcfg,
+                  "# mine\nDEVICE=eth0\nONBOOT=yes\nBOOTPROTO=static\nIPADDR=192.0.2.10\nNETMASK=255.255.255.0\n");
+    }
+
+    // The command whose text begins so ends with that status; all others succeed.
+    void Fails(const std::string &beginning, int status = 1)
+    {
+        commands_.OnCommand(
+            [=](const std::string &command) { return CommandReply{command.starts_with(beginning) ? status : 0}; });
+    }
+
+    static TAVONETCARD Card(int mode, const char *address = "", const char *mask = "")
+    {
+        TAVONETCARD card = {};
+        card.nMode = mode;
+        std::strcpy(card.szInterface, "eth0");
+        std::strcpy(card.szIp, address);
+        std::strcpy(card.szMask, mask);
+        return card;
+    }
+
+    const std::string kIfcfg = test::kScripts + "ifcfg-eth0";
+    test::RecordedCommands commands_;
+};
+
+TEST_F(NetSettings, AStaticAddressIsAppliedAndStored)
+{
+    WriteFile("/etc/resolv.conf.bak", "");
+    std::filesystem::create_directories("/etc/ppp");
+    WriteFile("/etc/ppp/old_gateway.bak", "");
+    SetRoutes("");
+    test::ForgetFault();
+    const TAVONETCARD card = Card(TAVO_NET_STATIC, "192.0.2.020", "255.255.255.000");
+    ASSERT_EQ(TAVONetSetCard1(&card, nullptr), 0);
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    EXPECT_THAT(commands_.Commands(),
+                ElementsAre(Quiet("/sbin/ifconfig eth0 192.0.2.20 netmask 255.255.255.0 broadcast 192.0.2.255"),
+                            Quiet("/sbin/route add -net 192.0.2.0 netmask 255.255.255.0 dev eth0"),
+                            Quiet("/sbin/route add default gw 192.0.2.1")));
+    EXPECT_EQ(ReadFile(kIfcfg), "# mine\nDEVICE=eth0\nONBOOT=yes\nBOOTPROTO=static\nIPADDR=192.0.2.20\n"
+                                "NETMASK=255.255.255.0\nBROADCAST=192.0.2.255\nNETWORK=192.0.2.0\n");
+    EXPECT_FALSE(std::filesystem::exists("/etc/resolv.conf.bak"));
+    EXPECT_FALSE(std::filesystem::exists("/etc/ppp/old_gateway.bak"));
+    EXPECT_THAT(log_.Texts(), ElementsAre(MatchesRegex(
+                                  "net_set_card1\\([0-9]+\\) : HUP ddnsd result: no such service or not enabled ")));
+
+    // The same once more: the name service need not know, and the routes are there.
+    SetRoutes("eth0\t000200C0\t00000000\t0001\t0\t0\t0\t00FFFFFF\t0\t0\t0\n"
+              "eth0\t00000000\t010200C0\t0003\t0\t0\t0\t00000000\t0\t0\t0\n");
+    log_.Clear();
+    commands_.Clear();
+    ASSERT_EQ(TAVONetSetCard1(&card, &card), 0);
+    EXPECT_EQ(commands_.Commands().size(), 1u);
+    EXPECT_THAT(log_.Texts(), IsEmpty());
+}
+
+TEST_F(NetSettings, AnAddressThatIsNotTakenLeavesTheOldOne)
+{
+    const std::string before = ReadFile(kIfcfg);
+    Fails("/sbin/ifconfig eth0 192.0.2.20");
+    const TAVONETCARD card = Card(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0");
+    EXPECT_EQ(TAVONetSetCard1(&card, nullptr), -1);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_set_card1"}));
+    EXPECT_THAT(commands_.Commands(),
+                ElementsAre(HasSubstr("192.0.2.20"),
+                            Quiet("/sbin/ifconfig eth0 192.0.2.10 netmask 255.255.255.0 broadcast 192.0.2.255")));
+    EXPECT_EQ(ReadFile(kIfcfg), before);
+}
+
+TEST_F(NetSettings, DhcpTakesTheStaticSettingsOut)
+{
+    WriteFile(kIfcfg,
+              "DEVICE=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.10\nNETMASK=255.255.255.0\nMASTER=bond0\nSLAVE=yes\n"
+              "USERCTL=no\n");
+    const TAVONETCARD card = Card(TAVO_NET_DHCP);
+    ASSERT_EQ(TAVONetSetCard1(&card, nullptr), 0);
+    EXPECT_THAT(commands_.Commands(),
+                ElementsAre(Quiet("/sbin/ifconfig eth0 0.0.0.0"), Quiet("/sbin/dhcpcd -n eth0 -t 30")));
+    EXPECT_EQ(ReadFile(kIfcfg), "DEVICE=eth0\nBOOTPROTO=dhcp\nUSERCTL=no\nONBOOT=yes\n");
+    EXPECT_THAT(Sleeps(), ElementsAre("sleep 1"));
+}
+
+TEST_F(NetSettings, WithoutALeaseTheOldAddressComesBack)
+{
+    const std::string before = ReadFile(kIfcfg);
+    Fails("/sbin/dhcpcd");
+    const TAVONETCARD card = Card(TAVO_NET_DHCP);
+    EXPECT_EQ(TAVONetSetCard1(&card, nullptr), -1);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_set_card1"}));
+    EXPECT_EQ(commands_.Commands().back(),
+              Quiet("/sbin/ifconfig eth0 192.0.2.10 netmask 255.255.255.0 broadcast 192.0.2.255"));
+    EXPECT_EQ(ReadFile(kIfcfg), before);
+    EXPECT_THAT(log_.Texts(), ElementsAre(MatchesRegex("net_set_card1\\([0-9]+\\) run dhcpcd error .*")));
+
+    // Of an interface that had a lease the client's own file knows it.
+    WriteFile(kIfcfg, "DEVICE=eth0\nBOOTPROTO=dhcp\n");
+    WriteFile("/etc/dhcpc/dhcpcd-eth0.info", "IPADDR=192.0.2.77\nNETMASK=255.255.0.0\n");
+    Fails("/sbin/");
+    log_.Clear();
+    commands_.Clear();
+    EXPECT_EQ(TAVONetSetCard1(&card, nullptr), -1);
+    EXPECT_EQ(commands_.Commands().back(),
+              Quiet("/sbin/ifconfig eth0 192.0.2.77 netmask 255.255.0.0 broadcast 192.0.255.255"));
+    EXPECT_THAT(log_.Texts(),
+                ElementsAre(MatchesRegex("net_set_card1:[0-9]+ Initial setting interface \\[eth0\\] error .*"),
+                            HasSubstr("run dhcpcd error"),
+                            MatchesRegex("net_set_card1\\([0-9]+\\): TAVOIRecoverIPSetting failed.\\(2A00\\)")));
+    std::filesystem::remove("/etc/dhcpc/dhcpcd-eth0.info");
+}
+
+// A process of ours under another program's name; ends with the test.
+class Client {
+  public:
+    explicit Client(const char *name)
+    {
+        int ends[2];
+        EXPECT_EQ(::pipe2(ends, O_CLOEXEC), 0);
+        pid_ = ::fork();
+        if (pid_ == 0) {
+            ::dup2(ends[0], 0);
+            ::execl("/bin/bash", name, "-c", "read x; :", nullptr);
+            ::_exit(127);
+        }
+        ::close(ends[0]);
+        input_ = ends[1];
+        const std::string line = "/proc/" + std::to_string(pid_) + "/cmdline";
+        for (int i = 0; i < 1000 && !ReadFile(line).starts_with(name); ++i)
+            ::usleep(10000);
+        WriteFile(kPidFile, std::to_string(pid_) + "\n");
+    }
+    ~Client()
+    {
+        ::close(input_);
+        if (!ended_)
+            End();
+        ::unlink(kPidFile);
+    }
+
+    // The signal that it died of, 0 for none.
+    int End()
+    {
+        ::close(input_);
+        input_ = -1;
+        int status = 0;
+        ::waitpid(pid_, &status, 0);
+        ended_ = true;
+        return WIFSIGNALED(status) ? WTERMSIG(status) : 0;
+    }
+
+    pid_t Pid() const { return pid_; }
+
+    static constexpr const char *kPidFile = "/etc/dhcpc/dhcpcd-eth0.pid";
+
+  private:
+    pid_t pid_ = -1;
+    int input_ = -1;
+    bool ended_ = false;
+};
+
+TEST_F(NetSettings, ARunningClientIsKilledFirst)
+{
+    Client client("dhcpcd");
+    const TAVONETCARD card = Card(TAVO_NET_DHCP);
+    EXPECT_EQ(TAVONetSetCard1(&card, nullptr), 0);
+    EXPECT_EQ(client.End(), SIGKILL);
+    EXPECT_FALSE(std::filesystem::exists(Client::kPidFile));
+    EXPECT_THAT(log_.Texts(), IsEmpty());
+}
+
+TEST_F(NetSettings, AProcessThatGotTheClientsOldNumberLives)
+{
+    Client client("smbd");
+    const TAVONETCARD card = Card(TAVO_NET_DHCP);
+    EXPECT_EQ(TAVONetSetCard1(&card, nullptr), 0);
+    EXPECT_EQ(client.End(), 0);
+}
+
+TEST_F(NetSettings, AClientThatCannotBeKilledEndsTheChange)
+{
+    Client client("dhcpcd");
+    const std::string before = ReadFile(kIfcfg);
+    unkillable = true;
+    const TAVONETCARD card = Card(TAVO_NET_DHCP);
+    EXPECT_EQ(TAVONetSetCard1(&card, nullptr), -1);
+    unkillable = false;
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_set_card1"}));
+    EXPECT_EQ(Sleeps(), std::vector<std::string>(30, "sleep 1"));
+    EXPECT_EQ(log_.Lines().size(), 30u);
+    EXPECT_THAT(log_.Texts(),
+                Each(EndsWith(" dhcpcd pid[" + std::to_string(client.Pid()) + "] still exists, wait 1 second.")));
+    EXPECT_THAT(commands_.Commands(), ElementsAre(HasSubstr("/sbin/ifconfig eth0 192.0.2.10 ")));
+    EXPECT_EQ(ReadFile(kIfcfg), before);
+}
+
+TEST_F(NetSettings, TheCardIsReadFromItsFileAndTheKernel)
+{
+    TAVONETCARD card = {};
+    test::ForgetFault();
+    ASSERT_EQ(TAVONetGetCard1(&card), 0);
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    EXPECT_EQ(card.nMode, TAVO_NET_STATIC);
+    EXPECT_STREQ(card.szInterface, "eth0");
+    EXPECT_STREQ(card.szIp, "192.0.2.10");
+    EXPECT_STREQ(card.szMask, "255.255.255.0");
+    EXPECT_STREQ(card.szBroadcast, "192.0.2.255");
+    EXPECT_STREQ(card.szNetwork, "192.0.2.0");
+    EXPECT_STREQ(card.szGateway, "192.0.2.1");
+    EXPECT_STREQ(card.szMac, "02:00:00:00:00:0a");
+    EXPECT_EQ(card.nMtu, 9000);
+    EXPECT_EQ(card.fLink, 1);
+
+    tree_.Remove("/sys/class/net");
+    EXPECT_EQ(TAVONetGetCard1(&card), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_FILE_NOT_FOUND);
+}
+
+TEST_F(NetSettings, TheGatewayIsStoredBetweenTheTwoCommands)
+{
+    ASSERT_EQ(TAVONetDefaultGatewaySet("192.0.2.254"), 0);
+    EXPECT_THAT(commands_.Commands(),
+                ElementsAre(Quiet("/sbin/route delete default"), Quiet("/sbin/route add default gw 192.0.2.254")));
+    EXPECT_EQ(ReadFile("/etc/sysconfig/network"), "GATEWAY=192.0.2.254\nHOSTNAME=tavo\n");
+    char text[16];
+    EXPECT_EQ(TAVONetDefaultGatewayGetConf(text, sizeof text), 0);
+    EXPECT_STREQ(text, "192.0.2.254");
+    EXPECT_EQ(TAVONetDefaultGatewayGet(text, sizeof text), 0);
+    EXPECT_STREQ(text, "192.0.2.1");
+    EXPECT_EQ(TAVONetDefaultGatewayGet(text, 9), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_NOT_ENOUGH_MEMORY);
+}
+
+TEST_F(NetSettings, AGatewayThatCannotBeReachedIsPutBack)
+{
+    Fails("/sbin/route add default gw 198.51.100.1");
+    EXPECT_EQ(TAVONetDefaultGatewaySet("198.51.100.1"), -1);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_default_gateway_set"}));
+    EXPECT_THAT(commands_.Commands(), ElementsAre(HasSubstr("delete default"), HasSubstr("198.51.100.1"),
+                                                  Quiet("/sbin/route add default gw 192.0.2.1")));
+    EXPECT_EQ(ReadFile("/etc/sysconfig/network"), "GATEWAY=192.0.2.1\nHOSTNAME=tavo\n");
+    EXPECT_THAT(log_.Texts(), ElementsAre(EndsWith("): failed to set default gateway.")));
+
+    commands_.Clear();
+    for (const char *bad : {"", "127.0.0.1", "10.0.0.255", "192.0.2.1;reboot", "-host"}) {
+        EXPECT_EQ(TAVONetDefaultGatewaySet(bad), -1) << bad;
+        EXPECT_EQ(TLIBErrGet(), ERR_INVALID_NETNAME) << bad;
+    }
+    EXPECT_THAT(commands_.Commands(), IsEmpty()) << "looked at before the old route goes";
+}
+
+TEST_F(NetSettings, AnUnknownRouteTableIsSaidSo)
+{
+    tree_.Put("/proc/net/route", "Destination Gateway\n");
+    char text[16];
+    EXPECT_EQ(TAVONetDefaultGatewayGet(text, sizeof text), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_FORMAT_ERROR);
+    EXPECT_THAT(
+        log_.Texts(),
+        ElementsAre(MatchesRegex("net_default_gateway_get \\([0-9]+\\) Unknow kernel routing table format, errno=.*")));
+}
+
+class ServerList {
+  public:
+    explicit ServerList(const std::vector<const char *> &items = {})
+    {
+        for (const char *item : items)
+            TLIBSzListPush(&list_, item);
+    }
+    ~ServerList() { TLIBSzListFree(list_); }
+
+    TLIBSZLIST *list_ = PslTLIBSzListAlloc(512);
+};
+
+TEST_F(NetSettings, NameServersGoThroughALink)
+{
+    std::filesystem::create_directories("/var/ns");
+    std::filesystem::remove("/etc/resolv.conf");
+    std::filesystem::create_symlink("/var/ns/resolv", "/etc/resolv.conf");
+    WriteFile("/var/ns/resolv", "nameserver 198.51.100.9\n");
+    const ServerList two({"192.0.2.053", "2001:db8::1"});
+    test::ForgetFault();
+    ASSERT_EQ(TAVONetDNSSet(two.list_), 0);
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    EXPECT_EQ(ReadFile("/var/ns/resolv"), "nameserver\t192.0.2.53\nnameserver\t2001:db8::1\n");
+    EXPECT_TRUE(std::filesystem::is_symlink("/etc/resolv.conf"));
+
+    ServerList found;
+    EXPECT_EQ(TAVONetDNSGet(&found.list_), 2);
+    EXPECT_STREQ(SzTLIBSzListGet(found.list_, 1), "2001:db8::1");
+
+    for (const char *bad : {"127.0.0.1", "ns.example.com", "1.2.3.4\nsearch x", "fe80::1%eth0", ""}) {
+        log_.Clear();
+        const ServerList list({"192.0.2.1", bad});
+        EXPECT_EQ(TAVONetDNSSet(list.list_), -1) << bad;
+        EXPECT_EQ(LastFault(), (test::Fault{ERR_INVALID_NETNAME, "net_dns_set"}));
+        EXPECT_THAT(log_.Texts(), ElementsAre(HasSubstr(") Bad DNS ")));
+    }
+    EXPECT_EQ(ReadFile("/var/ns/resolv"), "nameserver\t192.0.2.53\nnameserver\t2001:db8::1\n");
+    std::filesystem::remove("/etc/resolv.conf");
+}
+
+TEST_F(NetSettings, TheHostNameKeepsTheAdministratorsLines)
+{
+    WriteFile("/etc/hosts", "127.0.0.1 localhost\n192.0.2.10 tavo\n# printers\n192.0.2.50\tlp lp.local\n");
+    test::ForgetFault();
+    ASSERT_EQ(TAVOLnxSetHostname("attic"), 0);
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    EXPECT_EQ(ReadFile("/etc/hosts"), "127.0.0.1\tlocalhost\n192.0.2.10\tattic\n# printers\n192.0.2.50\tlp lp.local\n");
+    EXPECT_EQ(ReadFile("/etc/sysconfig/network"), "GATEWAY=192.0.2.1\nHOSTNAME=attic\n");
+    EXPECT_EQ(named_host, "attic");
+    char name[16];
+    EXPECT_EQ(TAVOLnxGetHostname(name, sizeof name), 0);
+    EXPECT_STREQ(name, "attic");
+}
+
+TEST_F(NetSettings, TheMtuHasAKeyForEachInterface)
+{
+    WriteFile("/etc/tavoinfo.conf", "eth1_mtu=\"4000\"\nrunsamba=\"yes\"\n");
+    char text[16];
+    test::ForgetFault();
+    EXPECT_EQ(TAVOConfGetMTUValue("eth0", text, sizeof text), 0);
+    EXPECT_STREQ(text, "1500");
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    EXPECT_EQ(TAVOGetMTUSetting("eth1"), 4000);
+    EXPECT_EQ(TAVONetSetMTUValue("eth0", 9000), 0);
+    EXPECT_EQ(TAVOGetMTUSetting("eth0"), 9000);
+    EXPECT_THAT(commands_.Commands(), ElementsAre(Quiet("/sbin/ifconfig eth0 mtu 9000")));
+    EXPECT_THAT(ReadFile("/etc/tavoinfo.conf"),
+                AllOf(HasSubstr("eth1_mtu=\"4000\"\nrunsamba=\"yes\"\n"), HasSubstr("eth0_mtu=")));
+
+    Fails("/sbin/ifconfig");
+    EXPECT_EQ(TAVONetSetMTUEth("eth0", 1400), -1);
+    EXPECT_THAT(log_.Texts(), ElementsAre(EndsWith("Failed to ifconfig MTU Value(0x2A00)")));
+    for (const int bad : {-1, 0, 67, 65536})
+        EXPECT_EQ(TAVONetSetMTUValue("eth0", bad), -1) << bad;
+    EXPECT_EQ(TAVOGetMTUSetting("eth0"), 9000);
+    log_.Clear();
+    EXPECT_EQ(TAVOConfGetMTUValue("abcdefghijklmnop", text, sizeof text), -1);
+    EXPECT_THAT(log_.Texts(), ElementsAre(EndsWith(" interface name is too long")));
+    WriteFile("/etc/tavoinfo.conf", "eth1_mtu=\"4k\"\n");
+    EXPECT_EQ(TAVOGetMTUSetting("eth1"), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_FORMAT_ERROR);
+}
+
+TEST_F(NetSettings, AConflictIsWhatAnswersAPing)
+{
+    EXPECT_EQ(TAVOIIpConflict("eth0", "192.0.2.10"), 0);
+    EXPECT_THAT(commands_.Commands(), IsEmpty()) << "our own address";
+    EXPECT_EQ(TAVOIIpConflict("eth0", "192.0.2.11"), 1);
+    EXPECT_THAT(commands_.Commands(), ElementsAre(Quiet("/bin/ping -c 1 -w 2 192.0.2.11")));
+    const struct {
+        int status, answer;
+    } rows[] = {{1, 0}, {2, 0}, {127, -1}};
+    for (const auto &row : rows) {
+        log_.Clear();
+        test::ForgetFault();
+        Fails("/bin/ping", row.status);
+        EXPECT_EQ(TAVOIIpConflict("eth0", "192.0.2.11"), row.answer) << row.status;
+        EXPECT_EQ(TLIBErrGet(), row.answer < 0 ? ERR_OP_FAILURE : ERR_SUCCESS);
+        EXPECT_EQ(log_.Lines().empty(), row.answer == 0);
+    }
+    EXPECT_THAT(log_.Texts(), ElementsAre(MatchesRegex("net_ip_conflict\\([0-9]+\\): system\\(/bin/ping -c 1 -w 2 "
+                                                       "192.0.2.11 > /dev/null 2>&1\\) failed.\\(strerror=.*\\)")));
+}
+
+TEST_F(NetSettings, IsDhcpRepairsAFileThatDoesNotSay)
+{
+    const struct {
+        const char *file;
+        int answer;
+    } rows[] = {{"BOOTPROTO=dhcp\n", 1}, {"BOOTPROTO=DHCP\n", 0}, {"BOOTPROTO=dhcpx\n", 0}, {"BOOTPROTO=static\n", 0}};
+    for (const auto &row : rows) {
+        WriteFile(kIfcfg, row.file);
+        EXPECT_EQ(BlTAVOLnxIsDHCP("eth0"), row.answer) << row.file;
+        EXPECT_EQ(ReadFile(kIfcfg), row.file);
+    }
+    EXPECT_THAT(log_.Texts(), IsEmpty());
+    WriteFile(kIfcfg, "DEVICE=eth0\n");
+    EXPECT_EQ(BlTAVOLnxIsDHCP("eth0"), 0);
+    EXPECT_EQ(ReadFile(kIfcfg), "DEVICE=eth0\nBOOTPROTO=static\n");
+    EXPECT_THAT(log_.Texts(), ElementsAre(EndsWith(") Get BOOTPROTO failed.(2000)")));
+    EXPECT_EQ(BlTAVOLnxIsDHCP(""), 0);
+    EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+}
+
+TEST_F(NetSettings, RoutesAreAddedAndRemoved)
+{
+    EXPECT_EQ(TAVONetRouteAdd("010.20.0.0", "255.255.0.0", "ppp0"), 0);
+    EXPECT_EQ(TAVONetRouteDel("10.20.0.0", "255.255.0.0", "eth0"), 0);
+    EXPECT_THAT(commands_.Commands(),
+                ElementsAre(Quiet("/sbin/route add -net 10.20.0.0 netmask 255.255.0.0 dev ppp0"),
+                            Quiet("/sbin/route del -net 10.20.0.0 netmask 255.255.0.0 dev eth0")));
+    Fails("/sbin/route");
+    EXPECT_EQ(TAVONetRouteAdd("10.20.0.0", "255.255.0.0", "eth0"), -1);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_route_add"}));
+    commands_.Clear();
+    const char *const rows[][3] = {{"10.20.0.1", "255.255.0.0", "eth0"},
+                                   {"10.20.0.0", "255.0.255.0", "eth0"},
+                                   {"default", "255.255.0.0", "eth0"},
+                                   {"10.20.0.0", "255.255.0.0", "eth0;reboot"}};
+    for (const auto &row : rows) {
+        EXPECT_EQ(TAVONetRouteAdd(row[0], row[1], row[2]), -1) << row[0];
+        EXPECT_EQ(TAVONetRouteDel(row[0], row[1], row[2]), -1) << row[0];
+    }
+    EXPECT_THAT(commands_.Commands(), IsEmpty());
+}
+
+TEST_F(NetSettings, IPv6IsSwitchedForOneInterface)
+{
+    EXPECT_EQ(TAVONetIPv6Set("eth0", 0), 0);
+    EXPECT_EQ(TAVONetIPv6Set("eth0", 1), 0);
+    EXPECT_THAT(commands_.Commands(), ElementsAre("/bin/echo 1 > /proc/sys/net/ipv6/conf/eth0/disable_ipv6",
+                                                  "/bin/echo 0 > /proc/sys/net/ipv6/conf/eth0/disable_ipv6"));
+    Fails("/bin/echo", 2);
+    EXPECT_EQ(TAVONetIPv6Set("eth0", 1), -1);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_ipv6_set"}));
+    EXPECT_EQ(TAVONetIPv6Set("../all", 1), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+}
+
+TEST_F(NetSettings, APortIsInUseWhenASocketHasIt)
+{
+    const std::string header = "  sl  local_address rem_address   st\n";
+    tree_.Put("/proc/net/tcp", header + "   0: 0100007F:1F90 00000000:0000 0A\n");
+    tree_.Put("/proc/net/udp", header + "  12: 00000000:270F 00000000:0000 07\n");
+    EXPECT_EQ(BlTLIBIsPortInUse(8080), 1);
+    EXPECT_EQ(BlTLIBIsPortInUse(9999), 1);
+    test::ForgetFault();
+    EXPECT_EQ(BlTLIBIsPortInUse(10), 0) << "a state is no port";
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    EXPECT_EQ(BlTLIBIsPortInUse(0), 0);
+    EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+    tree_.Remove("/proc/net/udp");
+    EXPECT_EQ(BlTLIBIsPortInUse(10), 0);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OPEN_FAILED, "net_is_port_in_use"}));
+    EXPECT_THAT(log_.Texts(), ElementsAre(MatchesRegex("net_is_port_in_use:[0-9]+ Fail to open \\[/proc/net/udp\\], "
+                                                       "errno=\\[2/.*\\]")));
+}
+
+// Whatever is passed for an interface, an address or a name: nothing runs and no file changes.
+TEST_F(NetSettings, HostileNamesAreRefused)
+{
+    const std::string file = ReadFile(kIfcfg);
+    const std::string network = ReadFile("/etc/sysconfig/network");
+    ::unlink(test::kCanary);
+    for (std::string name : test::HostileNames()) {
+        if (const size_t at = name.find("sda"); at != name.npos)
+            name.replace(at, 3, "eth0");
+        const char *const text = name.c_str();
+        char buffer[64];
+        TAVONETCARD card = Card(TAVO_NET_DHCP);
+        std::strncpy(card.szInterface, text, sizeof card.szInterface);
+        TAVONETCARD address = Card(TAVO_NET_STATIC, "", "255.255.255.0");
+        std::strncpy(address.szIp, text, sizeof address.szIp);
+        TAVONETLINKAGGR bond = {};
+        std::strncpy(bond.szBond, text, sizeof bond.szBond);
+        TAVONETLINKAGGR member = {"bond0", TAVO_NET_AGGR_BACKUP, 0, 1, {}, {}};
+        std::strncpy(member.rgszMember[0], text, sizeof member.rgszMember[0]);
+        const ServerList servers({text});
+        const int results[] = {
+            TAVONetSetCard1(&card, nullptr),     TAVONetSetCard1(&address, nullptr),
+            TAVONetDefaultGatewaySet(text),      TAVOLnxSetHostname(text),
+            TAVONetDNSSet(servers.list_),        TAVONetSetMTUValue(text, 1500),
+            TAVONetSetMTUEth(text, 1500),        TAVOConfGetMTUValue(text, buffer, sizeof buffer),
+            TAVOIIpConflict(text, "192.0.2.11"), TAVOIIpConflict("eth0", text),
+            TAVONetLinkAggrSet(&bond),           TAVONetLinkAggrSet(&member),
+            TAVONetLinkAggrGet(text, &bond),
+        };
+        EXPECT_THAT(results, Each(-1)) << name;
+        EXPECT_EQ(BlTAVOLnxIsDHCP(text), 0) << name;
+        EXPECT_EQ(BlTLIBIsConnected(text), 0) << name;
+    }
+    EXPECT_THAT(commands_.Commands(), IsEmpty());
+    EXPECT_FALSE(std::filesystem::exists(test::kCanary));
+    EXPECT_EQ(ReadFile(kIfcfg), file);
+    EXPECT_EQ(ReadFile("/etc/sysconfig/network"), network);
+    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(test::kScripts), {}), 1);
+}
+
+}  // namespace
+
+extern "C" {
+
+int sethostname(const char *name, size_t length) noexcept
+{
+    named_host.assign(name, length);
+    return 0;
+}
+
+int kill(pid_t pid, int signal) noexcept
+{
+    if (unkillable) {
+        errno = EPERM;
+        return -1;
+    }
+    return static_cast<int>(::syscall(SYS_kill, pid, signal));
+}
+
+long syscall(long number, ...) noexcept
+{
+    va_list list;
+    va_start(list, number);
+    long args[6];
+    for (long &arg : args)
+        arg = va_arg(list, long);
+    va_end(list);
+    if (unkillable && number == SYS_pidfd_send_signal) {
+        errno = EPERM;
+        return -1;
+    }
+    using Syscall = long(long, ...);
+    static Syscall *const real = reinterpret_cast<Syscall *>(::dlsym(RTLD_NEXT, "syscall"));
+    return real(number, args[0], args[1], args[2], args[3], args[4], args[5]);
+}
+}
