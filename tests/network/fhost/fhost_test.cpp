@@ -1,0 +1,278 @@
+// Discovery: the packets and whom they are sent to, and the list of those who answered.
+#include "tavo_fhost.h"
+
+#include "network/net/cards.h"
+
+#include <functional>
+
+#include <fcntl.h>
+#include <sys/socket.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+using test::Cards;
+using test::LastFault;
+using test::ReadFile;
+using test::WriteFile;
+using testing::ElementsAre;
+using testing::EndsWith;
+using testing::IsEmpty;
+using testing::MatchesRegex;
+
+namespace {
+
+constexpr const char *kList = "/tmp/tavods.list";
+constexpr const char *kTaken = "/tmp/tavods.list.tmp";
+
+struct Sent {
+    std::string from, to, bytes;
+
+    bool operator==(const Sent &) const = default;
+};
+
+std::vector<Sent> sent;
+std::string bound;
+std::string no_send_from;
+std::string no_bind_to;
+
+std::string Text(const sockaddr *address)
+{
+    sockaddr_in where;
+    std::memcpy(&where, address, sizeof where);
+    return std::string(::inet_ntoa(where.sin_addr)) + ":" + std::to_string(ntohs(where.sin_port));
+}
+
+class Discovery : public Cards {
+  protected:
+    Discovery()
+    {
+        sent.clear();
+        no_send_from = no_bind_to = "";
+        std::filesystem::remove_all(kList);
+        std::filesystem::remove_all(kTaken);
+    }
+};
+
+const std::string kQuery("\x12\x34\x56\x78TAVO\x01\x04\x01\x00\x00\x00\xA4\x04\x00\x00\x02\x01", 20);
+
+TEST(DiscoveryPackets, AreTheseBytes)
+{
+    const auto text = [](const uint8_t *bytes, int32_t size) {
+        return std::string(reinterpret_cast<const char *>(bytes), static_cast<size_t>(size));
+    };
+    std::string v11 = kQuery;
+    v11.back() = 0;
+    EXPECT_EQ(text(stFHOSTHeader, FHOSTHeaderSize), kQuery.substr(0, 8));
+    EXPECT_EQ(text(stFHOSTBroadCast, FHOSTBroadCastSize), kQuery.substr(0, 8) + std::string(2, '\0'));
+    EXPECT_EQ(text(stFHOSTBroadCastV11, FHOSTBroadCastSizeV11), v11);
+    EXPECT_EQ(text(stFHOSTBroadCastVDS20, FHOSTBroadCastSizeVDS20), kQuery);
+}
+
+TEST_F(Discovery, TheQueryLeavesTwiceFromEveryCard)
+{
+    EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u) << "no card";
+    EXPECT_THAT(sent, IsEmpty());
+    AddCard("eth0", "192.0.2.10");
+    AddCard("eth1", "198.51.100.10");
+    EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u);
+    const Sent first = {"192.0.2.10:0", "255.255.255.255:9999", kQuery};
+    const Sent second = {"198.51.100.10:0", "255.255.255.255:9999", kQuery};
+    EXPECT_TRUE(sent == std::vector<Sent>({first, second, first, second}));
+}
+
+TEST_F(Discovery, EachFailureIsABitAndTheOthersAreTried)
+{
+    AddCard("eth0", "192.0.2.10");
+    AddCard("eth1");  // no address
+    AddCard("eth2", "192.0.2.12");
+    AddCard("eth3", "192.0.2.13");
+    AddCard("eth10", "192.0.2.20");
+    no_bind_to = "192.0.2.12:0";
+    no_send_from = "192.0.2.13:0";
+    EXPECT_EQ(ErrFHOSTSendBroadcastUdp("hello", 5), 0xEu);
+    ASSERT_EQ(sent.size(), 2u);
+    EXPECT_EQ(sent[1].from, "192.0.2.20:0") << "the last one";
+    EXPECT_EQ(sent[1].bytes, "hello");
+    EXPECT_THAT(log_.Texts(), ElementsAre(MatchesRegex("bind\\(sockfd=[0-9]+, brdcast.sin_addr.s_addr = [0-9]+\\) "
+                                                       "error!! errno=99, err_str=\\[.*\\]"),
+                                          "sendto error."));
+}
+
+TEST_F(Discovery, TenCardsAreMoreThanAreAsked)
+{
+    for (int i = 0; i < 10; ++i)
+        AddCard("eth" + std::to_string(i), "192.0.2." + std::to_string(10 + i));
+    EXPECT_EQ(ErrFHOSTSendBroadcastUdp("x", 1), 0u);
+    EXPECT_EQ(sent.size(), 8u);
+}
+
+// A process that bears the daemon's name.
+class Daemon {
+  public:
+    Daemon()
+    {
+        int ends[2];
+        EXPECT_EQ(::pipe2(ends, O_CLOEXEC), 0);
+        pid_ = ::fork();
+        if (pid_ == 0) {
+            ::dup2(ends[0], 0);
+            ::execl("/bin/bash", "/usr/tavo/bin/findhostd", "-c", "read x; :", nullptr);
+            ::_exit(127);
+        }
+        ::close(ends[0]);
+        input_ = ends[1];
+        for (int i = 0; i < 1000 && !ReadFile("/proc/" + std::to_string(pid_) + "/cmdline").starts_with("/usr/tavo");
+             ++i)
+            ::usleep(10000);
+    }
+    ~Daemon()
+    {
+        ::close(input_);
+        ::waitpid(pid_, nullptr, 0);
+    }
+
+  private:
+    pid_t pid_ = -1;
+    int input_ = -1;
+};
+
+TEST_F(Discovery, WithoutADaemonNothingIsCollected)
+{
+    EXPECT_EQ(TAVOFHOSTDumpHost(), -1);
+    EXPECT_THAT(Sleeps(), ElementsAre("sleep 3"));
+    EXPECT_THAT(log_.Texts().at(0), MatchesRegex("fhost_dump_host\\([0-9]+\\): findhostd daemon is not running ...."));
+    EXPECT_THAT(sent, IsEmpty());
+}
+
+TEST_F(Discovery, TheListIsHandedOver)
+{
+    const Daemon daemon;
+    AddCard("eth0", "192.0.2.10");
+    WriteFile(kList, "1,240,nas,192.0.2.11,x\n");
+    EXPECT_EQ(TAVOFHOSTDumpHost(), 0);
+    EXPECT_THAT(Sleeps(), ElementsAre("sleep 10"));
+    EXPECT_EQ(sent.size(), 2u);
+    EXPECT_EQ(ReadFile(kTaken), "1,240,nas,192.0.2.11,x\n");
+    EXPECT_FALSE(std::filesystem::exists(kList));
+
+    no_send_from = "192.0.2.10:0";
+    log_.Clear();
+    EXPECT_EQ(TAVOFHOSTDumpHost(), -1);
+    EXPECT_THAT(log_.Texts().back(), EndsWith("): ErrFHOSTSendQueryPkt() failed!"));
+    EXPECT_EQ(ReadFile(kList), "") << "made for the daemon";
+}
+
+TEST_F(Discovery, WhatSomebodyLeftInTheListsPlaceGoes)
+{
+    const Daemon daemon;
+    test::ScratchDir elsewhere;
+    const std::string victim = elsewhere / "shadow";
+    WriteFile(victim, "root:x\n");
+    const std::vector<std::function<void()>> plants = {
+        [&] { std::filesystem::create_symlink(victim, kList); },
+        [&] { std::filesystem::create_hard_link(victim, kList); },
+        [&] { EXPECT_EQ(::mkfifo(kList, 0666), 0); },
+    };
+    for (size_t i = 0; i < plants.size(); ++i) {
+        std::filesystem::remove(kTaken);
+        plants[i]();
+        EXPECT_EQ(TAVOFHOSTDumpHost(), 0) << i;
+        EXPECT_TRUE(std::filesystem::is_regular_file(std::filesystem::symlink_status(kTaken))) << i;
+        EXPECT_EQ(ReadFile(kTaken), "") << i;
+        EXPECT_EQ(ReadFile(victim), "root:x\n") << i;
+    }
+}
+
+class Hosts {
+  public:
+    ~Hosts() { TLIBSzHashFree(hash_); }
+
+    std::string operator[](const char *key) const
+    {
+        const char *const value = SzTLIBSzHashGetValue(hash_, key);
+        return value ? value : "none";
+    }
+
+    TLIBSZHASH *hash_ = PshTLIBSzHashAlloc(1024);
+};
+
+TEST_F(Discovery, TheListIsReadLineByLine)
+{
+    Hosts hosts;
+    WriteFile(kTaken, "1,240,host,10.0.0.5,x\n"
+                      "  2,239,old,10.0.0.6,x  \n"
+                      "0,240,nomodel,10.0.0.7,x\n"
+                      "x,240,nomodel,10.0.0.7,x\n"
+                      "1,240,short,10.0.0.8\n"
+                      "\n"
+                      "\t3,255,other,10.0.0.9,x,y,z\r\n"
+                      "1,240,host,10.0.0.5,again\n"
+                      "1,240,liar,10.0.0.5;x,x\n"
+                      "1,240,\x1B[2J,10.0.0.10,x");
+    EXPECT_EQ(TAVOFHOSTGet2Hash(&hosts.hash_), 3);
+    EXPECT_EQ(hosts["host(10.0.0.5)"], "10.0.0.5");
+    EXPECT_EQ(hosts["other(10.0.0.9)"], "10.0.0.9");
+    EXPECT_EQ(hosts["\x1B[2J(10.0.0.10)"], "10.0.0.10") << "showing it safely is the reader's affair";
+    EXPECT_THAT(log_.Texts(),
+                ElementsAre(EndsWith(" model number == 0"), EndsWith(" model number == 0"),
+                            EndsWith(" field number < 5"), EndsWith(" field number < 5"), EndsWith(" not an address")));
+    EXPECT_FALSE(std::filesystem::exists(kTaken));
+
+    EXPECT_EQ(TAVOFHOSTGet2Hash(&hosts.hash_), 0);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OPEN_FAILED, "fhost_get2_hash"}));
+    EXPECT_EQ(TAVOFHOSTGet2Hash(nullptr), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+}
+
+TEST_F(Discovery, AHashThatMustGrowStaysTheCallers)
+{
+    Hosts hosts;
+    std::string list;
+    for (int i = 0; i < 2000; ++i)
+        list += "1,240," + std::string(250, 'n') + std::to_string(i) + ",10.0." + std::to_string(i / 200) + "." +
+                std::to_string(i % 200 + 1) + ",x\n";
+    WriteFile(kTaken, list);
+    EXPECT_EQ(TAVOFHOSTGet2Hash(&hosts.hash_), 2000);
+}
+
+TEST_F(Discovery, AListThatIsNotOursIsNotRead)
+{
+    Hosts hosts;
+    test::ScratchDir elsewhere;
+    const std::string secret = elsewhere / "list";
+    WriteFile(secret, "1,240,host,10.0.0.5,x\n");
+    std::filesystem::create_symlink(secret, kTaken);
+    EXPECT_EQ(TAVOFHOSTGet2Hash(&hosts.hash_), 0);
+    EXPECT_EQ(TLIBErrGet(), ERR_OPEN_FAILED);
+    std::filesystem::remove(kTaken);
+    ASSERT_EQ(::mkfifo(kTaken, 0666), 0);
+    EXPECT_EQ(TAVOFHOSTGet2Hash(&hosts.hash_), 0) << "and it does not wait";
+    std::filesystem::remove(kTaken);
+    WriteFile(kTaken, "1,240,host,10.0.0.5,x\n");
+    if (::chown(kTaken, 1000, 1000) == 0) {
+        EXPECT_EQ(TAVOFHOSTGet2Hash(&hosts.hash_), 0) << "another user's";
+    }
+    EXPECT_TRUE(std::filesystem::exists(secret));
+}
+
+}  // namespace
+
+extern "C" {
+
+int bind(int, const sockaddr *address, socklen_t) noexcept
+{
+    bound = Text(address);
+    if (bound != no_bind_to)
+        return 0;
+    errno = EADDRNOTAVAIL;
+    return -1;
+}
+
+ssize_t sendto(int, const void *bytes, size_t size, int, const sockaddr *to, socklen_t)
+{
+    if (bound == no_send_from)
+        return static_cast<ssize_t>(size) - 1;
+    sent.push_back({bound, Text(to), std::string(static_cast<const char *>(bytes), size)});
+    return static_cast<ssize_t>(size);
+}
+}
