@@ -33,9 +33,10 @@ enum { TAVO_NET_AGGR_NONE = 0, TAVO_NET_AGGR_LACP = 1, TAVO_NET_AGGR_ADAPTIVE = 
 
 /* A bond: several interfaces that work as one. */
 typedef struct TAVONETLINKAGGR {
-    char szBond[20];       /* "bond0" */
-    int32_t nMode;         /* TAVO_NET_AGGR_NONE: no bond */
-    uint32_t fSlaveOption; /* 0: of a dissolved bond members without a saved file, too, become plain interfaces (DHCP) */
+    char szBond[20]; /* "bond0" */
+    int32_t nMode;   /* TAVO_NET_AGGR_NONE: no bond */
+    uint32_t
+        fSlaveOption; /* 0: of a dissolved bond members without a saved file, too, become plain interfaces (DHCP) */
     int32_t nMember;
     char rgszMember[TAVO_NET_MEMBERS][20];
     char szPartner[20]; /* of an 802.3ad bond, the hardware address of the switch; "" for none. Not set, only read */
