@@ -157,7 +157,7 @@ TEST(UserStore, DamageOfEveryKind)
             ::unlink("/tmp/.db.user.seal");
         },
         [&](const char *) {
-            ::symlink("/var", "/tmp/.db.user.tmp");
+            EXPECT_EQ(::symlink("/var", "/tmp/.db.user.tmp"), 0);
             ::unlink("/tmp/.db.user.seal");
         },
     };
