@@ -496,13 +496,13 @@ TEST_F(NetSettings, HostileNamesAreRefused)
         const char *const text = name.c_str();
         char buffer[64];
         TAVONETCARD card = Card(TAVO_NET_DHCP);
-        std::strncpy(card.szInterface, text, sizeof card.szInterface);
+        name.copy(card.szInterface, sizeof card.szInterface);
         TAVONETCARD address = Card(TAVO_NET_STATIC, "", "255.255.255.0");
-        std::strncpy(address.szIp, text, sizeof address.szIp);
+        name.copy(address.szIp, sizeof address.szIp);
         TAVONETLINKAGGR bond = {};
-        std::strncpy(bond.szBond, text, sizeof bond.szBond);
+        name.copy(bond.szBond, sizeof bond.szBond);
         TAVONETLINKAGGR member = {"bond0", TAVO_NET_AGGR_BACKUP, 0, 1, {}, {}};
-        std::strncpy(member.rgszMember[0], text, sizeof member.rgszMember[0]);
+        name.copy(member.rgszMember[0], sizeof member.rgszMember[0]);  // whole or cut, as a careless caller would
         const ServerList servers({text});
         const int results[] = {
             TAVONetSetCard1(&card, nullptr),     TAVONetSetCard1(&address, nullptr),
