@@ -135,6 +135,9 @@ TEST(TimedExec, TheLimitIsExact)
         std::string what;
         std::unique_ptr<test::OwnChild> child;
     };
+    const auto finish = [](Run &run) {
+        EXPECT_EQ(run.child->Status(), 0) << run.what;
+    };
     std::vector<Run> runs;
     for (const auto &row : surroundings) {
         for (const Case &one : cases) {
@@ -143,10 +146,15 @@ TEST(TimedExec, TheLimitIsExact)
                                 // A loaded machine may be late once, not three times.
                                 ::_exit(is_right(one) || is_right(one) || is_right(one) ? 0 : 1);
                             })});
+            // A single processor has no time for a dozen at once.
+            if (::sysconf(_SC_NPROCESSORS_ONLN) == 1) {
+                finish(runs.back());
+                runs.pop_back();
+            }
         }
     }
     for (Run &run : runs)
-        EXPECT_EQ(run.child->Status(), 0) << run.what;
+        finish(run);
 }
 
 TEST(TimedExec, KillsWhatTheProgramHasStartedAndLeavesNoZombie)
