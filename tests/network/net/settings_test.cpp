@@ -484,6 +484,14 @@ TEST_F(NetSettings, APortIsInUseWhenASocketHasIt)
                                                        "errno=\\[2/.*\\]")));
 }
 
+// As a careless caller fills a record: whole, or cut without an end.
+template <size_t Size>
+void Fill(char (&field)[Size], const std::string &text)
+{
+    std::memset(field, 0, Size);
+    text.copy(field, Size);
+}
+
 // Whatever is passed for an interface, an address or a name: nothing runs and no file changes.
 TEST_F(NetSettings, HostileNamesAreRefused)
 {
@@ -496,13 +504,13 @@ TEST_F(NetSettings, HostileNamesAreRefused)
         const char *const text = name.c_str();
         char buffer[64];
         TAVONETCARD card = Card(TAVO_NET_DHCP);
-        name.copy(card.szInterface, sizeof card.szInterface);
+        Fill(card.szInterface, name);
         TAVONETCARD address = Card(TAVO_NET_STATIC, "", "255.255.255.0");
-        name.copy(address.szIp, sizeof address.szIp);
+        Fill(address.szIp, name);
         TAVONETLINKAGGR bond = {};
-        name.copy(bond.szBond, sizeof bond.szBond);
+        Fill(bond.szBond, name);
         TAVONETLINKAGGR member = {"bond0", TAVO_NET_AGGR_BACKUP, 0, 1, {}, {}};
-        name.copy(member.rgszMember[0], sizeof member.rgszMember[0]);  // whole or cut, as a careless caller would
+        Fill(member.rgszMember[0], name);
         const ServerList servers({text});
         const int results[] = {
             TAVONetSetCard1(&card, nullptr),     TAVONetSetCard1(&address, nullptr),
