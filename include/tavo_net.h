@@ -176,9 +176,58 @@ TAVO_API int BlTLIBIsPortInUse(int port);
 TAVO_API int TAVONetRouteAdd(const char *szNet, const char *szMask, const char *szInterface);
 TAVO_API int TAVONetRouteDel(const char *szNet, const char *szMask, const char *szInterface);
 
-/* Switches IPv6 on an interface on (fEnable not 0) or off, in the kernel alone. Returns 0, or -1 with ERR_BAD_PARAMETERS,
- * ERR_LOCK_FAILED or ERR_OP_FAILURE (there is no such interface, or the kernel has no IPv6). */
+/* Whether a DHCP server answers on an interface within cSeconds (at least 1); no lease is taken (/sbin/dhcpcd -T). Returns
+ * 0 when one answers, 1 when none does, or -1 with ERR_BAD_PARAMETERS or ERR_OP_FAILURE (the client cannot be run). */
+TAVO_API int TAVONetDhcpTest(const char *szInterface, int cSeconds);
+
+/*
+ * IPv6. The functions that change an interface do so in the kernel first and then store in its file what the start-up
+ * scripts need (IPV6INIT, IPV6ADDR, IPV6PREFIXLENG). They return 0; -2 when the kernel has the change but the file could
+ * not be written; or -1 with nothing changed and
+ *   ERR_BAD_PARAMETERS   a pointer is NULL, or the interface is no name
+ *   ERR_INVALID_NETNAME  the address, the network or the gateway is not valid, or nPrefix is not 0 to 128 bits
+ *   ERR_LOCK_FAILED
+ *   ERR_OP_FAILURE       the kernel refused: no such interface, no IPv6, there already, or not there to remove
+ */
+
+/* Switches IPv6 on an interface on (fEnable not 0) or off. */
 TAVO_API int TAVONetIPv6Set(const char *szInterface, int fEnable);
+
+/* 1 when the interface speaks IPv6, else 0; also 0 with ERR_BAD_PARAMETERS or ERR_OPEN_FAILED (there is no such
+ * interface, or the kernel has no IPv6). */
+TAVO_API int BlTAVONetIPv6IsEnabled(const char *szInterface);
+
+/* Gives an interface an address and takes it back (/sbin/ip). One address is stored: the one that was added last. */
+TAVO_API int TAVONetIPv6AddrAdd(const char *szInterface, const char *szAddr, int nPrefix);
+TAVO_API int TAVONetIPv6AddrDel(const char *szInterface, const char *szAddr, int nPrefix);
+
+/* Pushes the addresses of an interface, as "ADDRESS/PREFIX", onto *ppAddrs, which may move (/proc/net/if_inet6). Returns
+ * how many, or -1 with ERR_BAD_PARAMETERS or ERR_OUT_OF_MEMORY. */
+TAVO_API int TAVONetIPv6AddrEnum(const char *szInterface, TLIBSZLIST **ppAddrs);
+
+/* Adds or removes the route to a network, in the kernel alone; "::" with the length 0 is the default route. szGateway is
+ * the router's address, NULL for a network that the interface itself is on. */
+TAVO_API int TAVONetIPv6RouteAdd(const char *szInterface, const char *szNet, int nPrefix, const char *szGateway);
+TAVO_API int TAVONetIPv6RouteDel(const char *szInterface, const char *szNet, int nPrefix, const char *szGateway);
+
+/* Waits for the DHCPv6 client (dhcp6c) of an interface to end, cSeconds at most. Returns 0 when none runs, or -1 with
+ * ERR_BAD_PARAMETERS or ERR_TIMER_EXPIRED. */
+TAVO_API int TAVONetDhcp6Wait(const char *szInterface, int cSeconds);
+
+/*
+ * Wake-on-LAN: only where "support_wol" in /etc/tavoinfo.conf is "yes" (else ERR_OP_UNREGISTERED). Most models ask and tell
+ * the card itself; where the factory settings say "wol_by_panel" the controller of the front panel (/dev/ttyS1) does the
+ * waking. Common codes: ERR_BAD_PARAMETERS, ERR_OP_FAILURE (the card or the controller refuses).
+ */
+
+/* 1 when the interface wakes the appliance, 0 when it does not, -1 on error. */
+TAVO_API int TAVONetWolGet(const char *szInterface);
+
+/* Lets the interface wake the appliance (fEnable not 0; on which packets is said by "wol_enabled_options" in
+ * /etc/tavoinfo.conf, letters as ethtool knows them, such as "g") or no more, and stores that as "NAME_wol_options". The
+ * controller of a front panel cannot be told to stop. Returns 0, or -1 with ERR_KEY_NOT_FOUND or ERR_FORMAT_ERROR (no
+ * options to enable, or letters that are none), ERR_LOCK_FAILED or a code of the settings files. */
+TAVO_API int TAVONetWolSet(const char *szInterface, int fEnable);
 
 /*
  * Link aggregation.

@@ -59,8 +59,8 @@ DeviceTree *DeviceTree::Current()
 
 bool DeviceTree::Redirects(std::string_view path) const
 {
-    for (const std::string_view place :
-         {"/dev/sd", "/dev/md", "/sys/", "/proc/partitions", "/proc/mounts", "/proc/net/", "/etc.defaults/"}) {
+    for (const std::string_view place : {"/dev/sd", "/dev/md", "/dev/ttyS1", "/sys/", "/proc/partitions",
+                                         "/proc/mounts", "/proc/net/", "/etc.defaults/"}) {
         if (path.starts_with(place))
             return true;
     }

@@ -1,5 +1,5 @@
 // Takes the place of the kernel's view of the disks: while one of these stands, this process finds /dev/sd*, /dev/md*,
-// /sys, /proc/partitions, /proc/mounts and the model's settings in a directory of the test's own. Programs that it
+// /dev/ttyS1, /sys, /proc/partitions, /proc/mounts and the model's settings in a directory of the test's own. Programs that it
 // starts do not.
 #ifndef TESTS_SUPPORT_DEVICE_TREE_H
 #define TESTS_SUPPORT_DEVICE_TREE_H

@@ -3,6 +3,8 @@
 
 #include "core/detail/guard.h"
 #include "core/detail/lock_hold.h"
+#include "core/detail/log.h"
+#include "network/detail/interface_file.h"
 #include "network/detail/interface_name.h"
 #include "network/detail/net_command.h"
 #include "network/detail/network_lock.h"
@@ -17,6 +19,14 @@ extern "C" int TAVONetIPv6Set(const char *szInterface, int fEnable)
             return Fail(ERR_LOCK_FAILED);
         const int status = tavo::RunNetCommand("/bin/echo %d > %s%s%s", fEnable ? 0 : 1, "/proc/sys/net/ipv6/conf/",
                                                szInterface, "/disable_ipv6");
-        return status == 0 ? 0 : Fail(ERR_OP_FAILURE);
+        if (status != 0)
+            return Fail(ERR_OP_FAILURE);
+        const tavo::SettingChange changes[] = {{"DEVICE", szInterface}, {"IPV6INIT", fEnable ? "yes" : "no"}};
+        if (const int code = tavo::RewriteSettings(tavo::InterfaceFile(szInterface), changes)) {
+            LogError("%s:%d Set %s error.", tavo::InterfaceFile(szInterface));
+            Fail(code);
+            return -2;
+        }
+        return 0;
     });
 }

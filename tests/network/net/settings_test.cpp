@@ -454,13 +454,17 @@ TEST_F(NetSettings, RoutesAreAddedAndRemoved)
 
 TEST_F(NetSettings, IPv6IsSwitchedForOneInterface)
 {
+    WriteFile(kIfcfg, "DEVICE=eth0\n");
     EXPECT_EQ(TAVONetIPv6Set("eth0", 0), 0);
+    EXPECT_EQ(ReadFile(kIfcfg), "DEVICE=eth0\nIPV6INIT=no\n");
     EXPECT_EQ(TAVONetIPv6Set("eth0", 1), 0);
+    EXPECT_EQ(ReadFile(kIfcfg), "DEVICE=eth0\nIPV6INIT=yes\n");
     EXPECT_THAT(commands_.Commands(), ElementsAre("/bin/echo 1 > /proc/sys/net/ipv6/conf/eth0/disable_ipv6",
                                                   "/bin/echo 0 > /proc/sys/net/ipv6/conf/eth0/disable_ipv6"));
     Fails("/bin/echo", 2);
-    EXPECT_EQ(TAVONetIPv6Set("eth0", 1), -1);
+    EXPECT_EQ(TAVONetIPv6Set("eth0", 0), -1);
     EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_ipv6_set"}));
+    EXPECT_EQ(ReadFile(kIfcfg), "DEVICE=eth0\nIPV6INIT=yes\n");
     EXPECT_EQ(TAVONetIPv6Set("../all", 1), -1);
     EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
 }

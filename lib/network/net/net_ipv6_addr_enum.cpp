@@ -1,0 +1,24 @@
+// Lists the IPv6 addresses of an interface.
+#include "tavo_net.h"
+
+#include "core/detail/guard.h"
+#include "network/detail/interface_name.h"
+#include "network/detail/ipv6_text.h"
+#include "network/detail/kernel_interface.h"
+
+extern "C" int TAVONetIPv6AddrEnum(const char *szInterface, TLIBSZLIST **ppAddrs)
+{
+    if (!szInterface || !tavo::IsInterfaceName(szInterface) || !ppAddrs || !*ppAddrs)
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        // Without the file the kernel has no IPv6, and so no interface has an address.
+        const std::string table = tavo::ReadKernelFile("/proc/net/if_inet6").value_or("");
+        int count = 0;
+        for (const std::string &address : tavo::ParseIpv6Table(table, szInterface)) {
+            if (TLIBSzListPush(ppAddrs, address.c_str()) < 0)
+                return Fail(ERR_OUT_OF_MEMORY);
+            ++count;
+        }
+        return count;
+    });
+}

@@ -1,0 +1,87 @@
+// Lets an interface wake the appliance, or no more.
+#include "tavo_net.h"
+
+#include "tavo_file.h"
+
+#include "core/detail/guard.h"
+#include "core/detail/lock_hold.h"
+#include "core/detail/log.h"
+#include "core/detail/open_file.h"
+#include "network/detail/interface_file.h"
+#include "network/detail/interface_name.h"
+#include "network/detail/network_lock.h"
+#include "network/detail/wake_on_lan.h"
+
+namespace {
+
+constexpr const char *kSettings = "/etc/tavoinfo.conf";
+constexpr const char *kPanel = "/dev/ttyS1";
+
+// Written as `echo "l"` does, but never waiting for the line, and never made this process's terminal.
+bool TellPanel()
+{
+    const tavo::Fd panel = tavo::OpenFd(kPanel, O_WRONLY | O_NOFOLLOW);
+    return panel && tavo::WriteAll(panel.Get(), "l\n");
+}
+
+// 0 or a code. The card forgets when the power goes, so that the start-up scripts need the options, too.
+int Store(const char *interface, const std::string &options)
+{
+    const tavo::LockHold lock(0x806, 5);
+    if (!lock) {
+        LogError("%s (%d) Failed to lock tavoinfo(%X)", TLIBErrGet());
+        return ERR_LOCK_FAILED;
+    }
+    return TLIBFileSetKeyValue(kSettings, tavo::WakeOptionsKey(interface).c_str(), options.c_str(), nullptr) < 0
+               ? TLIBErrGet()
+               : ERR_SUCCESS;
+}
+
+bool TellCard(const char *interface, uint32_t bits)
+{
+    const auto wake = tavo::GetWakeSettings(interface);
+    if (!wake) {
+        LogError("%s:%d Cannot get current wake-on-lan settings");
+        return false;
+    }
+    if (wake->enabled == bits)
+        return true;
+    if ((bits & ~wake->supported) != 0 || !tavo::SetWakeOptions(interface, bits)) {
+        LogError("%s:%d Cannot set new wake-on-lan settings");
+        return false;
+    }
+    return true;
+}
+
+}  // namespace
+
+extern "C" int TAVONetWolSet(const char *szInterface, int fEnable)
+{
+    if (!szInterface || !tavo::IsInterfaceName(szInterface))
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        if (!tavo::IsWakeOnLanSupported()) {
+            LogError("%s:%d Wake-on-lan isn't supported.");
+            return Fail(ERR_OP_UNREGISTERED);
+        }
+        const std::string options = fEnable ? tavo::ReadSetting(kSettings, "wol_enabled_options") : "d";
+        const auto bits = tavo::ParseWakeOptions(options);
+        if (!bits) {
+            LogError("%s:%d Miss wake-on-lan enable options.");
+            return Fail(options.empty() ? ERR_KEY_NOT_FOUND : ERR_FORMAT_ERROR);
+        }
+        const tavo::LockHold lock(tavo::kNetworkExclusive, tavo::kNetworkSeconds);
+        if (!lock)
+            return Fail(ERR_LOCK_FAILED);
+        if (tavo::IsWokenByPanel()) {
+            if (!fEnable)
+                return Fail(ERR_OP_UNREGISTERED);  // the controller knows no word for it
+            if (!TellPanel())
+                return Fail(ERR_OP_FAILURE);
+        } else if (!TellCard(szInterface, *bits)) {
+            return Fail(ERR_OP_FAILURE);
+        }
+        const int code = Store(szInterface, options);
+        return code == 0 ? 0 : Fail(code);
+    });
+}

@@ -1,0 +1,326 @@
+// IPv6 addresses and routes, wake-on-LAN and the DHCP clients: what is run, asked, stored and refused.
+#include "tavo_net.h"
+
+#include "cards.h"
+#include "support/hostile_names.h"
+#include "support/recorded_commands.h"
+
+#include <fcntl.h>
+#include <linux/ethtool.h>
+#include <linux/sockios.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+using test::Cards;
+using test::CommandReply;
+using test::LastFault;
+using test::ReadFile;
+using test::WriteFile;
+using testing::ElementsAre;
+using testing::EndsWith;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::MatchesRegex;
+
+namespace {
+
+constexpr const char *kTavoinfo = "/etc/tavoinfo.conf";
+
+std::string Quiet(const std::string &command)
+{
+    return command + " > /dev/null 2>&1";
+}
+
+// A card that knows wake-on-LAN.
+struct Wake {
+    uint32_t supported = WAKE_MAGIC | WAKE_PHY;
+    uint32_t enabled = 0;
+    int sets = 0;
+    bool answers = true;
+
+    int Answer(ifreq *ask)
+    {
+        ethtool_wolinfo info;
+        std::memcpy(&info, ask->ifr_data, sizeof info);
+        errno = EOPNOTSUPP;
+        if (!answers)
+            return -1;
+        if (info.cmd == ETHTOOL_GWOL) {
+            info.supported = supported;
+            info.wolopts = enabled;
+            std::memcpy(ask->ifr_data, &info, sizeof info);
+            return 0;
+        }
+        ++sets;
+        enabled = info.wolopts;
+        return info.cmd == ETHTOOL_SWOL ? 0 : -1;
+    }
+};
+
+class NetIPv6 : public Cards {
+  protected:
+    NetIPv6()
+    {
+        AddCard("eth0", "192.0.2.10");
+        WriteFile(kIfcfg, "DEVICE=eth0\nBOOTPROTO=dhcp\n");
+        WriteFile(kTavoinfo, "support_wol=\"yes\"\nwol_enabled_options=\"g\"\n");
+        calls_.OnIoctl([this](int, unsigned long request, void *argument) {
+            return request == SIOCETHTOOL ? wake_.Answer(static_cast<ifreq *>(argument)) : Answer(request, argument);
+        });
+    }
+
+    void Fails(const std::string &beginning, int status = 1)
+    {
+        commands_.OnCommand(
+            [=](const std::string &command) { return CommandReply{command.starts_with(beginning) ? status : 0}; });
+    }
+
+    const std::string kIfcfg = test::kScripts + "ifcfg-eth0";
+    test::RecordedCommands commands_;
+    Wake wake_;
+};
+
+TEST_F(NetIPv6, AddressesAreGivenStoredAndTakenBack)
+{
+    test::ForgetFault();
+    EXPECT_EQ(TAVONetIPv6AddrAdd("eth0", "2001:DB8:0:0::1", 64), 0);
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    EXPECT_EQ(ReadFile(kIfcfg), "DEVICE=eth0\nBOOTPROTO=dhcp\nIPV6INIT=yes\nIPV6ADDR=2001:db8::1\nIPV6PREFIXLENG=64\n");
+    EXPECT_EQ(TAVONetIPv6AddrDel("eth0", "2001:db8::2", 64), 0);
+    EXPECT_THAT(ReadFile(kIfcfg), HasSubstr("IPV6ADDR=2001:db8::1")) << "another one than the stored one";
+    EXPECT_EQ(TAVONetIPv6AddrDel("eth0", "2001:db8:0::1", 64), 0);
+    EXPECT_EQ(ReadFile(kIfcfg), "DEVICE=eth0\nBOOTPROTO=dhcp\nIPV6INIT=yes\n");
+    EXPECT_THAT(commands_.Commands(), ElementsAre(Quiet("/sbin/ip -6 addr add 2001:db8::1/64 dev eth0"),
+                                                  Quiet("/sbin/ip -6 addr del 2001:db8::2/64 dev eth0"),
+                                                  Quiet("/sbin/ip -6 addr del 2001:db8::1/64 dev eth0")));
+
+    Fails("/sbin/ip");
+    EXPECT_EQ(TAVONetIPv6AddrAdd("eth0", "2001:db8::7", 64), -1);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_ipv6_addr_add"}));
+    EXPECT_EQ(ReadFile(kIfcfg), "DEVICE=eth0\nBOOTPROTO=dhcp\nIPV6INIT=yes\n");
+}
+
+TEST_F(NetIPv6, RoutesGoToNetworks)
+{
+    EXPECT_EQ(TAVONetIPv6RouteAdd("eth0", "2001:db8:1::", 48, "fe80::1"), 0);
+    EXPECT_EQ(TAVONetIPv6RouteAdd("eth0", "::", 0, "2001:db8::ffff"), 0);
+    EXPECT_EQ(TAVONetIPv6RouteDel("eth0", "2001:db8:2::", 47, nullptr), 0);
+    EXPECT_THAT(commands_.Commands(), ElementsAre(Quiet("/sbin/ip -6 route add 2001:db8:1::/48 via fe80::1 dev eth0"),
+                                                  Quiet("/sbin/ip -6 route add ::/0 via 2001:db8::ffff dev eth0"),
+                                                  Quiet("/sbin/ip -6 route del 2001:db8:2::/47 dev eth0")));
+    Fails("/sbin/ip", 2);
+    EXPECT_EQ(TAVONetIPv6RouteDel("eth0", "::", 0, nullptr), -1);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_ipv6_route_del"}));
+}
+
+TEST_F(NetIPv6, WhatIsNoAddressIsRefused)
+{
+    const struct {
+        const char *interface, *text;
+        int length;
+        int address, route;  // the code when it is taken for an address, for a network; 0: fine
+    } rows[] = {
+        {"eth0", "2001:db8::1", -1, ERR_INVALID_NETNAME, ERR_INVALID_NETNAME},
+        {"eth0", "2001:db8::1", 129, ERR_INVALID_NETNAME, ERR_INVALID_NETNAME},
+        {"eth0", "2001:db8::1", 128, 0, 0},
+        {"eth0", "2001:db8::1", 127, 0, ERR_INVALID_NETNAME},
+        {"eth0", "fe80::1%eth0", 64, ERR_INVALID_NETNAME, ERR_INVALID_NETNAME},
+        {"eth0", "192.0.2.1", 24, ERR_INVALID_NETNAME, ERR_INVALID_NETNAME},
+        {"eth0", "::1;reboot", 128, ERR_INVALID_NETNAME, ERR_INVALID_NETNAME},
+        {"eth0", "ff02::1", 128, ERR_INVALID_NETNAME, 0},
+        {"eth0", "", 64, ERR_INVALID_NETNAME, ERR_INVALID_NETNAME},
+        {"eth0", nullptr, 64, ERR_BAD_PARAMETERS, ERR_BAD_PARAMETERS},
+        {"eth0;x", "2001:db8::", 64, ERR_BAD_PARAMETERS, ERR_BAD_PARAMETERS},
+        {nullptr, "2001:db8::", 64, ERR_BAD_PARAMETERS, ERR_BAD_PARAMETERS},
+    };
+    for (const auto &row : rows) {
+        SCOPED_TRACE(std::string(row.text ? row.text : "NULL") + "/" + std::to_string(row.length));
+        commands_.Clear();
+        const auto check = [&](int result, int code) {
+            EXPECT_EQ(result, code ? -1 : 0);
+            EXPECT_EQ(TLIBErrGet(), code);
+            test::ForgetFault();
+        };
+        test::ForgetFault();
+        check(TAVONetIPv6AddrAdd(row.interface, row.text, row.length), row.address);
+        check(TAVONetIPv6RouteAdd(row.interface, row.text, row.length, nullptr), row.route);
+        check(TAVONetIPv6RouteDel(row.interface, row.text, row.length, nullptr), row.route);
+        EXPECT_EQ(commands_.Commands().size(), (row.address == 0) + 2u * (row.route == 0));
+    }
+    EXPECT_EQ(TAVONetIPv6RouteAdd("eth0", "2001:db8::", 64, "::"), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_INVALID_NETNAME);
+    log_.Clear();
+    TAVONetIPv6AddrAdd("eth0", "::1", 129);
+    EXPECT_THAT(log_.Texts(), ElementsAre(MatchesRegex("net_ipv6_addr_add:[0-9]+ Paramter Prefix length 129 out of "
+                                                       "range \\[0, 128\\]")));
+}
+
+TEST_F(NetIPv6, AddressesComeFromTheKernelsTable)
+{
+    tree_.Put("/proc/net/if_inet6", "00000000000000000000000000000001 01 80 10 80       lo\n"
+                                    "20010db8000000000000000000000001 02 40 00 80     eth0\n"
+                                    "fe800000000000000000000000000a01 02 40 20 80     eth0\n"
+                                    "fe800000000000000000000000000b01 03 40 20 80    eth01\n"
+                                    "zz800000000000000000000000000b01 03 40 20 80     eth0\n"
+                                    "fe80 03 40 20 80     eth0\n"
+                                    "fe800000000000000000000000000b01 03 ff 20 80     eth0\n");
+    TLIBSZLIST *list = PslTLIBSzListAlloc(512);
+    EXPECT_EQ(TAVONetIPv6AddrEnum("eth0", &list), 2);
+    EXPECT_STREQ(SzTLIBSzListGet(list, 0), "2001:db8::1/64");
+    EXPECT_STREQ(SzTLIBSzListGet(list, 1), "fe80::a01/64");
+    tree_.Remove("/proc/net/if_inet6");
+    EXPECT_EQ(TAVONetIPv6AddrEnum("eth0", &list), 0);
+    EXPECT_EQ(TAVONetIPv6AddrEnum("../eth0", &list), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+    TLIBSzListFree(list);
+}
+
+TEST_F(NetIPv6, ACardIsToldWhatWakesTheAppliance)
+{
+    test::ForgetFault();
+    EXPECT_EQ(TAVONetWolGet("eth0"), 0);
+    EXPECT_EQ(TAVONetWolSet("eth0", 1), 0);
+    EXPECT_EQ(wake_.enabled, uint32_t{WAKE_MAGIC});
+    EXPECT_EQ(TAVONetWolGet("eth0"), 1);
+    EXPECT_THAT(ReadFile(kTavoinfo), EndsWith("eth0_wol_options=g\n"));
+    EXPECT_EQ(TAVONetWolSet("eth0", 1), 0);
+    EXPECT_EQ(wake_.sets, 1) << "it knows already";
+    EXPECT_EQ(TAVONetWolSet("eth0", 0), 0);
+    EXPECT_EQ(wake_.enabled, 0u);
+    EXPECT_THAT(ReadFile(kTavoinfo), EndsWith("eth0_wol_options=d\n"));
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    EXPECT_THAT(log_.Texts(), IsEmpty());
+}
+
+TEST_F(NetIPv6, WhatCannotWakeSaysWhy)
+{
+    const struct {
+        const char *settings;
+        bool answers;
+        int code;
+        const char *log;
+    } rows[] = {
+        {"wol_enabled_options=\"g\"\n", true, ERR_OP_UNREGISTERED, "Wake-on-lan isn't supported."},
+        {"support_wol=\"no\"\nwol_enabled_options=\"g\"\n", true, ERR_OP_UNREGISTERED, "Wake-on-lan isn't supported."},
+        {"support_wol=\"yes\"\n", true, ERR_KEY_NOT_FOUND, "Miss wake-on-lan enable options."},
+        {"support_wol=\"yes\"\nwol_enabled_options=\"gx\"\n", true, ERR_FORMAT_ERROR,
+         "Miss wake-on-lan enable options."},
+        {"support_wol=\"yes\"\nwol_enabled_options=\"g\"\n", false, ERR_OP_FAILURE,
+         "Cannot get current wake-on-lan settings"},
+        {"support_wol=\"yes\"\nwol_enabled_options=\"s\"\n", true, ERR_OP_FAILURE,
+         "Cannot set new wake-on-lan settings"},
+    };
+    for (const auto &row : rows) {
+        SCOPED_TRACE(row.settings);
+        WriteFile(kTavoinfo, row.settings);
+        wake_.answers = row.answers;
+        log_.Clear();
+        EXPECT_EQ(TAVONetWolSet("eth0", 1), -1);
+        EXPECT_EQ(LastFault(), (test::Fault{row.code, "net_wol_set"}));
+        EXPECT_THAT(log_.Texts(), ElementsAre(MatchesRegex("net_wol_set:[0-9]+ .*")));
+        EXPECT_THAT(log_.Texts(), ElementsAre(EndsWith(row.log)));
+        EXPECT_EQ(wake_.sets, 0);
+        EXPECT_EQ(ReadFile(kTavoinfo), row.settings);
+    }
+}
+
+TEST_F(NetIPv6, ThePanelIsToldOnlyOnModelsThatHaveOne)
+{
+    tree_.Put("/dev/ttyS1", "");
+    EXPECT_EQ(TAVONetWolSet("eth0", 1), 0);
+    EXPECT_EQ(ReadFile(tree_.Place("/dev/ttyS1")), "") << "here a console or a modem may hang";
+
+    tree_.Put("/etc.defaults/tavoinfo.conf", "wol_by_panel=\"yes\"\n");
+    WriteFile(kTavoinfo, "support_wol=\"yes\"\nwol_enabled_options=\"g\"\n");
+    wake_.sets = 0;
+    EXPECT_EQ(TAVONetWolGet("eth0"), 0);
+    EXPECT_EQ(TAVONetWolSet("eth0", 1), 0);
+    EXPECT_EQ(ReadFile(tree_.Place("/dev/ttyS1")), "l\n");
+    EXPECT_EQ(wake_.sets, 0);
+    EXPECT_EQ(TAVONetWolGet("eth0"), 1);
+    EXPECT_EQ(TAVONetWolSet("eth0", 0), -1);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_UNREGISTERED, "net_wol_set"}));
+    tree_.Remove("/dev/ttyS1");
+    EXPECT_EQ(TAVONetWolSet("eth0", 1), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_OP_FAILURE);
+}
+
+TEST_F(NetIPv6, TheDhcpTestTellsThreeThings)
+{
+    const struct {
+        int status, answer;
+    } rows[] = {{0, 0}, {1, 1}, {2, 1}, {126, -1}, {127, -1}};
+    for (const auto &row : rows) {
+        SCOPED_TRACE(row.status);
+        test::ForgetFault();
+        log_.Clear();
+        Fails("/sbin/dhcpcd", row.status);
+        EXPECT_EQ(TAVONetDhcpTest("eth0", 12), row.answer);
+        EXPECT_EQ(TLIBErrGet(), row.answer < 0 ? ERR_OP_FAILURE : ERR_SUCCESS);
+        EXPECT_EQ(log_.Lines().empty(), row.answer >= 0);
+    }
+    EXPECT_EQ(commands_.Commands().front(), Quiet("/sbin/dhcpcd -T eth0 -t 12"));
+    for (const char *bad : {"", "eth0;x", "-T"})
+        EXPECT_EQ(TAVONetDhcpTest(bad, 12), -1) << bad;
+    EXPECT_EQ(TAVONetDhcpTest("eth0", 0), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+}
+
+// Programs that bear the DHCPv6 client's name, for one interface each.
+TEST_F(NetIPv6, ADhcp6ClientIsWaitedForOnItsOwnInterface)
+{
+    int ends[2];
+    ASSERT_EQ(::pipe2(ends, O_CLOEXEC), 0);
+    const pid_t pid = ::fork();
+    if (pid == 0) {
+        ::dup2(ends[0], 0);
+        ::execl("/bin/bash", "/usr/sbin/dhcp6c", "-c", "read x; :", "-f", "eth0", nullptr);
+        ::_exit(127);
+    }
+    ::close(ends[0]);
+    for (int i = 0; i < 1000 && !ReadFile("/proc/" + std::to_string(pid) + "/cmdline").starts_with("/usr/sbin/"); ++i)
+        ::usleep(10000);
+
+    EXPECT_EQ(TAVONetDhcp6Wait("eth0", 3), -1);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_TIMER_EXPIRED, "net_dhcp6_wait"}));
+    EXPECT_THAT(Sleeps(), ElementsAre("sleep 1", "sleep 1", "sleep 1"));
+    calls_.Clear();
+    EXPECT_EQ(TAVONetDhcp6Wait("eth", 3), 0);
+    ::close(ends[1]);
+    int status = 0;
+    ::waitpid(pid, &status, 0);
+    EXPECT_EQ(TAVONetDhcp6Wait("eth0", 3), 0);
+    EXPECT_THAT(Sleeps(), IsEmpty());
+    EXPECT_EQ(TAVONetDhcp6Wait("eth0", -1), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+}
+
+TEST_F(NetIPv6, HostileNamesAreRefused)
+{
+    const std::string file = ReadFile(kIfcfg);
+    ::unlink(test::kCanary);
+    TLIBSZLIST *list = PslTLIBSzListAlloc(512);
+    for (const std::string &name : test::HostileNames()) {
+        const char *const text = name.c_str();
+        const int results[] = {
+            TAVONetIPv6Set(text, 1),
+            TAVONetIPv6AddrAdd(text, "2001:db8::1", 64),
+            TAVONetIPv6AddrAdd("eth0", text, 64),
+            TAVONetIPv6AddrDel("eth0", text, 64),
+            TAVONetIPv6AddrEnum(text, &list),
+            TAVONetIPv6RouteAdd("eth0", text, 64, nullptr),
+            TAVONetIPv6RouteDel("eth0", "2001:db8::", 64, text),
+            TAVONetDhcpTest(text, 1),
+            TAVONetDhcp6Wait(text, 1),
+            TAVONetWolGet(text),
+            TAVONetWolSet(text, 1),
+        };
+        EXPECT_THAT(results, testing::Each(-1)) << name;
+    }
+    TLIBSzListFree(list);
+    EXPECT_THAT(commands_.Commands(), IsEmpty());
+    EXPECT_FALSE(std::filesystem::exists(test::kCanary));
+    EXPECT_EQ(ReadFile(kIfcfg), file);
+}
+
+}  // namespace
