@@ -33,11 +33,27 @@ void MakeDevices(const std::string &place)
     }
 }
 
+bool IsLater(const timespec &one, const timespec &other)
+{
+    return one.tv_sec > other.tv_sec || (one.tv_sec == other.tv_sec && one.tv_nsec > other.tv_nsec);
+}
+
 timespec Now()
 {
     timespec now;
     ::clock_gettime(CLOCK_REALTIME_COARSE, &now);  // what files are stamped with
     return now;
+}
+
+// The stamp of everything that was written until now. What is written after this call has a later one: files are
+// stamped in steps of a few milliseconds, and a command may run and edit within one of them.
+timespec EndOfStamp()
+{
+    const timespec until = Now();
+    const timespec pause{0, 200'000};
+    while (!IsLater(Now(), until))
+        ::nanosleep(&pause, nullptr);
+    return until;
 }
 
 // A hard link shares its bytes with the tree. Programs and libraries are replaced, never edited; whoever edits one all
@@ -47,12 +63,8 @@ std::string EditedFile(const std::string &path, const timespec &since)
     struct stat facts;
     if (::lstat(path.c_str(), &facts) != 0)
         return "";
-    if (S_ISREG(facts.st_mode)) {
-        const timespec &edited = facts.st_mtim;
-        const bool later =
-            edited.tv_sec > since.tv_sec || (edited.tv_sec == since.tv_sec && edited.tv_nsec > since.tv_nsec);
-        return later ? path : "";
-    }
+    if (S_ISREG(facts.st_mode))
+        return IsLater(facts.st_mtim, since) ? path : "";
     if (S_ISDIR(facts.st_mode)) {
         for (const std::string &name : NamesIn(path)) {
             if (std::string found = EditedFile(path + "/" + name, since); !found.empty())
@@ -88,7 +100,7 @@ int EnterChroot(const Request &request, std::string *why)
         CopyFile(request.emulator, place + "/run/emulator");
 
     ::prctl(PR_SET_CHILD_SUBREAPER, 1, 0, 0, 0);
-    const timespec started = Now();
+    const timespec started = EndOfStamp();
     unfinished.clear();
     const pid_t command = ::fork();
     Must(command >= 0, "start", request.command[0]);
