@@ -119,7 +119,10 @@ int RunInForeground(const std::vector<std::string> &words)
     ::posix_spawnattr_init(&attributes);
     attended.Restore(attributes);
     pid_t pid = 0;
-    const int error = ::posix_spawn(&pid, program.c_str(), nullptr, &attributes, arguments.data(), environ);
+    // Asked beforehand, too: an emulator of single programs does not bring back why the child could not become it.
+    int error = ::access(program.c_str(), X_OK) == 0 ? 0 : errno;
+    if (!error)
+        error = ::posix_spawn(&pid, program.c_str(), nullptr, &attributes, arguments.data(), environ);
     ::posix_spawnattr_destroy(&attributes);
     if (error)
         throw Failure{.attempted = "run " + words[0],

@@ -3,7 +3,6 @@
 Nothing of a running machine lies in the file system: its disks are unlinked files, its lines to the host inherited
 sockets, and the emulator dies with the process that started it.
 """
-import ctypes
 import dataclasses
 import fcntl
 import hashlib
@@ -13,7 +12,6 @@ import re
 import selectors
 import shlex
 import shutil
-import signal
 import socket
 import struct
 import subprocess
@@ -66,11 +64,6 @@ class Outcome:
     def exit_code(self):
         """As a shell gives it."""
         return 128 + self.signal if self.signal else os.WEXITSTATUS(self.status)
-
-
-def _die_with_parent():
-    ctypes.CDLL(None).prctl(1, signal.SIGKILL)  # PR_SET_PDEATHSIG
-    os.setpgid(0, 0)  # an interrupt at the terminal is for us, who then end the machine
 
 
 class _Monitor:
@@ -171,7 +164,7 @@ class Machine:
             memory = (f'memory-backend-file,id=ram,size={hardware.memory}M,mem-path={memory_file},'
                       f'share={"off" if private else "on"}')
         command = [
-            'qemu-system-arm', '-nodefaults', '-no-user-config', '-no-reboot', '-display', 'none',
+            'setpriv', '--pdeathsig', 'KILL', 'qemu-system-arm', '-nodefaults', '-no-user-config', '-no-reboot', '-display', 'none',
             '-M', 'virt,memory-backend=ram', '-object', memory, '-m', str(hardware.memory),
             '-cpu', 'cortex-a15', '-accel', 'tcg', '-smp', '1',
             '-kernel', f'{self.image}/vmlinuz', '-initrd', f'{self.image}/root.cpio',
@@ -204,8 +197,9 @@ class Machine:
                         '-device', json.dumps(self._bay(bay))]
         if incoming:
             command += ['-incoming', 'defer']
+        # In a group of its own: an interrupt at the terminal is for us, who then end the machine.
         self.process = subprocess.Popen(command, stdin=subprocess.DEVNULL, stdout=subprocess.DEVNULL,
-                                        stderr=subprocess.PIPE, pass_fds=inherited, preexec_fn=_die_with_parent)
+                                        stderr=subprocess.PIPE, pass_fds=inherited, process_group=0)
         for peer in peers.values():
             peer.close()
         try:
@@ -329,7 +323,8 @@ class Machine:
         """Runs a program; output(stream, bytes) gets what it writes while it runs, stream is 'out' or 'err'.
 
         tick() is called at least once a second. Options: directory, memory (bytes), fresh (a throw-away copy of the
-        root), layer (a folder in the guest that lies over that copy), terminal ("rows columns": on the console).
+        root), layer (a folder in the guest that lies over that copy), host_at (where the share is shown there, too),
+        terminal ("rows columns": on the console).
         """
         self.tick = tick
         words = [f'env={variable}' for variable in environment]

@@ -5,8 +5,9 @@
 
 namespace machine {
 
-// Puts the calling process into a copy of the root whose changes end with it. Devices, /proc, /sys and /host are the
-// machine's own. What lies in the folder layer (if any) lies over the root there. Throws std::system_error.
-void EnterFreshRoot(const std::string &layer);
+// Puts the calling process into a copy of the root whose changes end with it. Devices, /sys and links are the machine's
+// own; with a folder as layer, which lies over the root then, they are those of an appliance root on a desk.
+// The host's folder is also shown as host_at, unless that is empty. Throws std::system_error.
+void EnterFreshRoot(const std::string &layer, const std::string &host_at);
 
 }  // namespace machine

@@ -78,7 +78,7 @@ void OpenConsole(const std::string &size)
         const rlimit no_core{0, 0};
         setrlimit(RLIMIT_CORE, &no_core);
         if (job.fresh)
-            EnterFreshRoot(job.layer);
+            EnterFreshRoot(job.layer, job.host_at);
         if (chdir(job.directory.c_str()) != 0)
             throw std::system_error(errno, std::generic_category(), job.directory);
         for (const std::string &variable : job.environment)
@@ -168,6 +168,8 @@ Job ParseJob(std::string_view payload)
             job.fresh = true;
         else if (name == "layer")
             job.layer = value;
+        else if (name == "host_at")
+            job.host_at = value;
         else if (name == "terminal")
             job.terminal = value;
     }

@@ -16,6 +16,7 @@ struct Job {
     long long memory = 0;  // bytes, 0: no limit
     bool fresh = false;    // in a throw-away copy of the root
     std::string layer;     // a folder that lies over that copy
+    std::string host_at;   // where the host's folder is shown, too, in that copy
     std::string terminal;  // on the console, with this size ("rows columns")
 };
 
