@@ -17,6 +17,12 @@ StringList::StringList() : list_(PslTLIBSzListAlloc(first_size))
         throw std::bad_alloc();
 }
 
+void StringList::Push(const std::string &item)
+{
+    if (TLIBSzListPush(&list_, item.c_str()) < 0)
+        throw std::bad_alloc();
+}
+
 std::vector<std::string> StringList::Items() const
 {
     std::vector<std::string> items;

@@ -20,6 +20,8 @@ class StringList {
     StringList &operator=(const StringList &) = delete;
 
     TLIBSZLIST **Address() { return &list_; }
+    const TLIBSZLIST *Get() const { return list_; }
+    void Push(const std::string &item);
     std::vector<std::string> Items() const;
 
   private:

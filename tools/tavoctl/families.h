@@ -11,12 +11,16 @@ AddFamily AddConf;
 AddFamily AddSection;
 AddFamily AddLock;
 AddFamily AddProc;
+AddFamily AddDisk;
+AddFamily AddPartition;
+AddFamily AddRaid;
+AddFamily AddLvm;
 AddFamily AddError;
 AddFamily AddVersion;
 
 // In the order of the help text.
 inline constexpr AddFamily *families[] = {
-    AddConf, AddSection, AddLock, AddProc, AddError, AddVersion,
+    AddConf, AddSection, AddLock, AddProc, AddDisk, AddPartition, AddRaid, AddLvm, AddError, AddVersion,
 };
 
 }  // namespace tavoctl

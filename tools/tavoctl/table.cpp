@@ -7,6 +7,8 @@
 
 #include <algorithm>
 #include <cctype>
+#include <cstdio>
+#include <iterator>
 
 namespace tavoctl {
 namespace {
@@ -26,6 +28,18 @@ std::string Joined(const std::vector<std::string> &texts)
     return joined;
 }
 
+std::string Readable(Bytes bytes)
+{
+    constexpr const char *units[] = {"B", "KiB", "MiB", "GiB", "TiB", "PiB"};
+    auto value = static_cast<double>(bytes.count);
+    std::size_t unit = 0;
+    for (; value >= 1024 && unit + 1 < std::size(units); ++unit)
+        value /= 1024;
+    char text[32];
+    std::snprintf(text, sizeof text, unit == 0 ? "%.0f %s" : "%.1f %s", value, units[unit]);
+    return text;
+}
+
 // The text in a column of that width; the last column of a line has no blanks behind it.
 std::string Padded(const std::string &text, std::size_t width, bool to_the_right, bool last)
 {
@@ -43,6 +57,8 @@ std::string Cell::Text() const
         return std::to_string(*number);
     if (const auto *truth = std::get_if<bool>(&value_))
         return *truth ? "yes" : "no";
+    if (const auto *bytes = std::get_if<Bytes>(&value_))
+        return Readable(*bytes);
     if (const auto *texts = std::get_if<std::vector<std::string>>(&value_))
         return Printable(Joined(*texts));
     return "-";
@@ -56,6 +72,8 @@ nlohmann::ordered_json Cell::Json() const
         [](const auto &value) -> nlohmann::ordered_json {
             if constexpr (std::is_same_v<std::decay_t<decltype(value)>, std::monostate>)
                 return nullptr;
+            else if constexpr (std::is_same_v<std::decay_t<decltype(value)>, Bytes>)
+                return value.count;
             else
                 return value;
         },

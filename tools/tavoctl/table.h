@@ -13,6 +13,11 @@
 
 namespace tavoctl {
 
+// A size: "465.8 GiB" in a table, the number of bytes in JSON.
+struct Bytes {
+    uint64_t count;
+};
+
 // One fact. The monostate is "not known": "-" in a table, null in JSON.
 class Cell {
   public:
@@ -22,14 +27,15 @@ class Cell {
     Cell(int number) : value_(int64_t{number}) {}
     Cell(int64_t number) : value_(number) {}
     Cell(bool truth) : value_(truth) {}
+    Cell(Bytes bytes) : value_(bytes) {}
     Cell(std::vector<std::string> texts) : value_(std::move(texts)) {}
 
-    bool IsNumber() const { return std::holds_alternative<int64_t>(value_); }
+    bool IsNumber() const { return std::holds_alternative<int64_t>(value_) || std::holds_alternative<Bytes>(value_); }
     std::string Text() const;  // printable
     nlohmann::ordered_json Json() const;
 
   private:
-    std::variant<std::monostate, std::string, int64_t, bool, std::vector<std::string>> value_;
+    std::variant<std::monostate, std::string, int64_t, bool, Bytes, std::vector<std::string>> value_;
 };
 
 class Table {

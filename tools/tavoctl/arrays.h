@@ -1,0 +1,52 @@
+// Arrays as the storage verbs show them.
+#ifndef TAVOCTL_ARRAYS_H
+#define TAVOCTL_ARRAYS_H
+
+#include "tavo_raid.h"
+
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace tavoctl {
+
+struct FreeArray {
+    void operator()(RAIDINFO *info) const { RAIDInfoFree(info); }
+};
+using Array = std::unique_ptr<RAIDINFO, FreeArray>;
+
+// "/dev/md2" of "md2", "2" or "/dev/md2"; throws a Failure for anything else.
+std::string ArrayPath(const std::string &word);
+
+// Throws a Failure when there is no such array.
+Array ReadArray(const std::string &path);
+std::vector<Array> ReadArrays();
+std::vector<std::string> ArrayNames();  // for completion
+
+const char *StatusText(int status);  // "degraded"
+std::string LevelText(int level);    // "raid5"
+std::optional<int> LevelOf(const std::string &word);
+
+// The paths of the members in one of these states, RAID_MEMBER_ bits.
+std::vector<std::string> Members(const RAIDINFO &info, int states);
+
+// What the kernel does to an array: "recover", "resync", "reshape", "check"; empty when nothing.
+std::string ActionOf(const RAIDINFO &info);
+
+struct Rebuild {
+    uint64_t done;   // sectors
+    uint64_t total;  // sectors, not 0
+    uint64_t speed;  // KiB a second; 0 when not known
+
+    int Percent() const { return static_cast<int>(done * 100 / total); }
+    std::string Text() const;  // "34 %, 52.3 MiB/s, 12 min 5 s left"
+};
+std::optional<Rebuild> RebuildOf(const RAIDINFO &info);
+
+// The arrays, "md0", that a disk or its partitions are members of.
+std::vector<std::string> ArraysOf(const std::vector<Array> &arrays, const std::string &disk);
+
+}  // namespace tavoctl
+
+#endif

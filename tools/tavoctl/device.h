@@ -1,0 +1,65 @@
+// Block devices as the storage verbs take them: their names, whether they sleep, and who uses them.
+#ifndef TAVOCTL_DEVICE_H
+#define TAVOCTL_DEVICE_H
+
+#include "tavo_disk.h"
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace tavoctl {
+
+// "/dev/sda3" of "sda3" or "/dev/sda3"; throws a Failure for what is no plain name of a device.
+std::string DevicePath(const std::string &word);
+std::string DeviceName(const std::string &path);  // "sda3"
+
+// The disk, whole, that a path names; throws a Failure when it is none, or not there.
+std::string DiskPath(const std::string &word);
+
+// All disks: the internal bays in their order, then the others by name.
+std::vector<std::string> DiskPaths();
+std::vector<std::string> DiskNames();    // for completion
+std::vector<std::string> DeviceNames();  // disks and partitions
+
+// "1" for an internal bay, "1-2" for a disk of an expansion unit, "usb", "esata".
+std::string BayOf(const std::string &disk);
+
+enum class Power { spinning, standby, unknown };
+
+// Asking wakes no disk.
+Power PowerOf(const std::string &disk);
+
+// A disk that does not tell may sleep.
+bool MayRead(const std::string &disk, bool wake);
+
+// Throws a Failure when reading the disk would wake it, unless wake is set.
+void RefuseToWake(const std::string &disk, bool wake, const std::string &attempted);
+
+// Throws a Failure when one of all disks is in standby, unless wake is set.
+void RefuseToWakeAny(bool wake, const std::string &attempted);
+
+struct Mount {
+    std::string source;
+    std::string place;
+};
+
+// /proc/mounts.
+std::vector<Mount> Mounts();
+
+// Why a device must not be overwritten, such as "/dev/sda1 is mounted on /mnt"; empty when nobody uses it.
+std::string UseOf(const std::string &device);
+
+// Throws a Failure when a device is in use, or is none.
+void RefuseUsed(const std::vector<std::string> &devices, const std::string &attempted);
+
+// The first line of a file of the kernel's.
+std::optional<std::string> KernelText(const std::string &path);
+
+// "/dev/sda, /dev/sdb"
+std::string Listed(const std::vector<std::string> &words);
+
+}  // namespace tavoctl
+
+#endif
