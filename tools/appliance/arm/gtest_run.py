@@ -32,7 +32,8 @@ class Reader:
 
     def __init__(self, cases):
         self.cases = {case.name: case for case in cases}
-        self.current, self.since = None, 0.0
+        self.current = None
+        self.since = 0.0  # the last beginning or end of a case
         self.rest, self.outside = b'', b''
 
     def feed(self, data):
@@ -63,8 +64,9 @@ class Reader:
 
     def close(self, verdict, detail=''):
         self.current.verdict, self.current.detail = verdict, detail
-        self.current.seconds = time.monotonic() - self.since
-        self.current = None
+        now = time.monotonic()
+        self.current.seconds = now - self.since
+        self.current, self.since = None, now
 
 
 def listed(text):
