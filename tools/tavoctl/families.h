@@ -15,12 +15,13 @@ AddFamily AddDisk;
 AddFamily AddPartition;
 AddFamily AddRaid;
 AddFamily AddLvm;
+AddFamily AddService;
 AddFamily AddError;
 AddFamily AddVersion;
 
 // In the order of the help text.
 inline constexpr AddFamily *families[] = {
-    AddConf, AddSection, AddLock, AddProc, AddDisk, AddPartition, AddRaid, AddLvm, AddError, AddVersion,
+    AddConf, AddSection, AddLock, AddProc, AddDisk, AddPartition, AddRaid, AddLvm, AddService, AddError, AddVersion,
 };
 
 }  // namespace tavoctl

@@ -1,6 +1,7 @@
 // tavoctl proc: programs and processes.
 #include "failure.h"
 #include "families.h"
+#include "processes.h"
 #include "program.h"
 #include "program_run.h"
 #include "signal_name.h"
@@ -8,11 +9,8 @@
 
 #include "tavo_proc.h"
 
-#include <algorithm>
 #include <array>
 #include <csignal>
-#include <fstream>
-#include <iterator>
 #include <limits>
 #include <utility>
 
@@ -20,36 +18,6 @@
 
 namespace tavoctl {
 namespace {
-
-// Every process that matches, also when there are more than were made room for.
-std::vector<pid_t> Matching(const std::string &pattern)
-{
-    std::vector<pid_t> pids(64);
-    for (;;) {
-        const int count = TLIBPs(pattern.c_str(), pids.data(), static_cast<int>(pids.size()));
-        if (count < 0)
-            throw LibraryFailure("find " + pattern);
-        const bool all = static_cast<std::size_t>(count) <= pids.size();
-        pids.resize(static_cast<std::size_t>(count));
-        if (all)
-            return pids;
-    }
-}
-
-// The command line; "[NAME]" for a process without one, such as a kernel thread. Empty when it has ended.
-std::string CommandLine(pid_t pid)
-{
-    const std::string folder = "/proc/" + std::to_string(pid);
-    std::ifstream in(folder + "/cmdline", std::ios::binary);
-    std::string words((std::istreambuf_iterator<char>(in)), {});
-    while (words.ends_with('\0'))
-        words.pop_back();
-    std::replace(words.begin(), words.end(), '\0', ' ');
-    std::string name;
-    if (words.empty() && std::getline(std::ifstream(folder + "/comm"), name))
-        words = "[" + name + "]";
-    return words;
-}
 
 class ProcFind : public Verb {
   public:
@@ -66,7 +34,7 @@ class ProcFind : public Verb {
     int Run(const Call &call) override
     {
         Table table({"pid", "command"});
-        for (const pid_t pid : Matching(pattern_)) {
+        for (const pid_t pid : MatchingProcesses(pattern_)) {
             // This process has the pattern among its arguments and always matches.
             if (pid == ::getpid())
                 continue;

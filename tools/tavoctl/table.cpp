@@ -60,7 +60,7 @@ std::string Cell::Text() const
     if (const auto *bytes = std::get_if<Bytes>(&value_))
         return Readable(*bytes);
     if (const auto *texts = std::get_if<std::vector<std::string>>(&value_))
-        return Printable(Joined(*texts));
+        return texts->empty() ? "-" : Printable(Joined(*texts));
     return "-";
 }
 

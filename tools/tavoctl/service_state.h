@@ -1,0 +1,38 @@
+// A service as it is at this moment.
+#ifndef TAVOCTL_SERVICE_STATE_H
+#define TAVOCTL_SERVICE_STATE_H
+
+#include <optional>
+#include <string>
+#include <vector>
+
+#include <sys/types.h>
+
+namespace tavoctl {
+
+struct ServiceState {
+    int id = 0;
+    std::string name;
+    std::optional<bool> enabled;  // empty: it has no key, or the key says neither
+    std::optional<bool> running;  // empty: nothing of its own runs
+    pid_t pid = 0;                // 0: not running, or no process of its own
+    std::string since;
+    std::vector<std::string> shares;
+    std::vector<std::string> volumes;  // where the links of its data folders lead, each volume once
+    std::optional<bool> bound;         // empty: it has no data folders; false: one of them is not there
+};
+
+// The id of a service by its name. Throws a Failure.
+int FindService(const std::string &name);
+
+// The status of a service without a process of its own needs a look at its key under the settings lock; may_wait false
+// leaves it out.
+ServiceState StateOf(int id, bool may_wait = true);
+
+// For completion.
+std::vector<std::string> ServiceNames();
+std::vector<std::string> MountedVolumes();
+
+}  // namespace tavoctl
+
+#endif
