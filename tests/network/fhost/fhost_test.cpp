@@ -138,6 +138,8 @@ class Daemon {
 
 TEST_F(Discovery, WithoutADaemonNothingIsCollected)
 {
+    std::filesystem::remove("/usr/tavo/bin/findhostd");
+    WriteFile("/usr/tavo/bin/findhostd", "#!/bin/sh\nexit 1\n", 0755);
     EXPECT_EQ(TAVOFHOSTDumpHost(), -1);
     EXPECT_THAT(Sleeps(), ElementsAre("sleep 3"));
     EXPECT_THAT(log_.Texts().at(0), MatchesRegex("fhost_dump_host\\([0-9]+\\): findhostd daemon is not running ...."));

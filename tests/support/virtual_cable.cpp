@@ -1,0 +1,214 @@
+// Appliances on one virtual cable.
+#include "support/virtual_cable.h"
+
+#include "support/scratch_dir.h"
+
+#include <gtest/gtest.h>
+
+#include <cerrno>
+#include <csignal>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+
+#include <fcntl.h>
+#include <sched.h>
+#include <sys/mount.h>
+#include <sys/prctl.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace test {
+namespace {
+
+constexpr int kNamespaces = CLONE_NEWNET | CLONE_NEWUTS | CLONE_NEWNS | CLONE_NEWPID;
+
+int StatusOf(pid_t pid)
+{
+    int status = 0;
+    while (::waitpid(pid, &status, 0) < 0 && errno == EINTR) {
+    }
+    return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
+}
+
+bool MountAnew(const char *type, const char *where, unsigned long flags = 0)
+{
+    return ::mount(type, where, type, flags, nullptr) == 0;
+}
+
+bool Settle(const std::string &host_name)
+{
+    // A file system of the machine may be seen anew only as it was seen before.
+    constexpr unsigned long flags = MS_NOSUID | MS_NODEV | MS_NOEXEC;
+    if (::mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0 || !MountAnew("proc", "/proc", flags) ||
+        !MountAnew("sysfs", "/sys", flags | MS_RDONLY) || !MountAnew("tmpfs", "/tmp") ||
+        !MountAnew("tmpfs", "/var/run") || ::sethostname(host_name.c_str(), host_name.size()) != 0)
+        return false;
+    ::chmod("/tmp", 01777);
+    for (const char *folder : {"/tmp/lock", "/tmp/etc"})
+        std::filesystem::create_directory(folder);
+    // Settings of its own, too.
+    return ShellStatus("cp -a /etc/. /tmp/etc/") == 0 && ::mount("/tmp/etc", "/etc", nullptr, MS_BIND, nullptr) == 0 &&
+           ShellStatus("ip link set lo up") == 0;
+}
+
+// Process 1 of a node: collects who has lost his parent.
+[[noreturn]] void BecomeInit(const std::string &host_name, int ready)
+{
+    ::prctl(PR_SET_PDEATHSIG, SIGKILL);
+    const pid_t settled = 0;
+    if (!Settle(host_name) || ::write(ready, &settled, sizeof settled) != sizeof settled)
+        ::_exit(1);
+    ::close(ready);
+    for (;;) {
+        if (::waitpid(-1, nullptr, 0) < 0)
+            ::usleep(20000);
+    }
+}
+
+[[noreturn]] void BecomeKeeper(const std::string &host_name, int ready)
+{
+    ::prctl(PR_SET_PDEATHSIG, SIGKILL);
+    if (::unshare(kNamespaces) != 0)
+        ::_exit(1);
+    const pid_t init = ::fork();
+    if (init == 0)
+        BecomeInit(host_name, ready);
+    (void)!::write(ready, &init, sizeof init);
+    ::close(ready);
+    ::_exit(StatusOf(init));
+}
+
+}  // namespace
+
+int ShellStatus(const std::string &command)
+{
+    const pid_t pid = ::fork();
+    if (pid == 0) {
+        ::execl("/bin/sh", "sh", "-c", command.c_str(), nullptr);
+        ::_exit(127);
+    }
+    return StatusOf(pid);
+}
+
+Node::Node(const std::string &host_name)
+{
+    int ready[2];
+    EXPECT_EQ(::pipe2(ready, O_CLOEXEC), 0);
+    keeper_ = ::fork();
+    if (keeper_ == 0)
+        BecomeKeeper(host_name, ready[1]);
+    ::close(ready[1]);
+    // Its process id and the news that it has settled, in whatever order.
+    for (int i = 0; i < 2; ++i) {
+        pid_t said = 0;
+        EXPECT_EQ(::read(ready[0], &said, sizeof said), static_cast<ssize_t>(sizeof said)) << "no namespaces";
+        pid_ = said > 0 ? said : pid_;
+    }
+    ::close(ready[0]);
+}
+
+Node::~Node()
+{
+    ::kill(pid_, SIGKILL);  // and with it everybody there
+    ::waitpid(keeper_, nullptr, 0);
+}
+
+void Node::Enter() const
+{
+    const std::string folder = "/proc/" + std::to_string(pid_) + "/ns/";
+    int fds[4];
+    const char *const names[] = {"net", "uts", "pid", "mnt"};
+    for (int i = 0; i < 4; ++i)
+        fds[i] = ::open((folder + names[i]).c_str(), O_RDONLY | O_CLOEXEC);
+    for (const int fd : fds) {
+        if (::setns(fd, 0) != 0)
+            ::_exit(125);
+        ::close(fd);
+    }
+    (void)!::chdir("/");
+    // In its process namespace are only the children.
+    const pid_t pid = ::fork();
+    if (pid != 0)
+        ::_exit(StatusOf(pid));
+}
+
+bool Node::Run(const std::function<bool()> &body) const
+{
+    const pid_t pid = ::fork();
+    if (pid == 0) {
+        Enter();
+        const bool done = body() && !testing::Test::HasFailure();
+        std::fflush(nullptr);
+        ::_exit(done ? 0 : 1);
+    }
+    return StatusOf(pid) == 0;
+}
+
+int Node::Shell(const std::string &command) const
+{
+    const pid_t pid = ::fork();
+    if (pid == 0) {
+        Enter();
+        ::execl("/bin/sh", "sh", "-c", command.c_str(), nullptr);
+        ::_exit(127);
+    }
+    return StatusOf(pid);
+}
+
+std::string Node::Output(const std::string &command) const
+{
+    const ScratchDir dir;
+    const std::string file = dir / "output";
+    const pid_t pid = ::fork();
+    if (pid == 0) {
+        const int out = ::open(file.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600);  // here, where the test can read it
+        ::dup2(out, 1);
+        Enter();
+        ::execl("/bin/sh", "sh", "-c", command.c_str(), nullptr);
+        ::_exit(127);
+    }
+    StatusOf(pid);
+    return ReadFile(file);
+}
+
+VirtualCable::VirtualCable(const std::string &name) : name_(name)
+{
+    EXPECT_EQ(test::ShellStatus("ip link add " + name_ + " type bridge && ip link set " + name_ + " up"), 0);
+}
+
+VirtualCable::~VirtualCable()
+{
+    for (const std::string &end : ends_)
+        test::ShellStatus("ip link del " + end + " 2>/dev/null");
+    test::ShellStatus("ip link del " + name_);
+}
+
+void VirtualCable::Plug(const Node &node, const std::string &card)
+{
+    const std::string end = name_ + std::to_string(ends_.size());
+    ends_.push_back(end);
+    // Not every ip can name the other end of a new pair; it is then veth0.
+    const std::string pid = std::to_string(node.Pid());
+    EXPECT_EQ(test::ShellStatus("ip link add " + end + " type veth && ip link set veth0 netns " + pid +
+                                " && ip link set " + end + " master " + name_ + " && ip link set " + end + " up"),
+              0);
+    EXPECT_EQ(node.Shell("ip link set veth0 name " + card), 0);
+}
+
+std::string VirtualCable::Missing()
+{
+    const char *const lacks = std::getenv("TAVO_ROOT_LACKS");
+    const std::string all = "," + std::string(lacks ? lacks : "") + ",";
+    for (const char *part : {"net", "uts", "mount", "sys"}) {
+        if (all.find("," + std::string(part) + ",") != std::string::npos)
+            return std::string("needs namespaces: ") + part;
+    }
+    if (test::ShellStatus("ip link add probe0 type veth 2>/dev/null && ip link del probe0") != 0)
+        return "this kernel makes no veth pairs here";
+    return "";
+}
+
+}  // namespace test

@@ -1,0 +1,391 @@
+// Appliances that find each other over real UDP, and what somebody hostile on the same cable can do: nothing.
+#include "packet.h"
+
+#include "tavo_fhost.h"
+#include "tavo_proc.h"
+
+#include "support/scratch_dir.h"
+#include "support/virtual_cable.h"
+
+#include <gmock/gmock.h>
+
+#include <algorithm>
+#include <csignal>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <optional>
+
+#include <arpa/inet.h>
+#include <dlfcn.h>
+#include <sys/socket.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+using test::Node;
+using test::ReadFile;
+using test::ShellStatus;
+using test::VirtualCable;
+using test::WriteFile;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::UnorderedElementsAre;
+
+namespace {
+
+constexpr const char *kList = "/tmp/tavods.list";
+constexpr const char *kDaemon = "/usr/tavo/bin/findhostd";
+constexpr const char *kPidFile = "/var/run/findhostd.pid";
+
+size_t awaited_lines = 0;  // the library sleeps until the list has so many, 20 seconds at most
+
+bool Eventually(const std::function<bool()> &condition)
+{
+    for (int i = 0; i < 2000; ++i) {
+        if (condition())
+            return true;
+        ::usleep(10000);
+    }
+    return false;
+}
+
+std::vector<std::string> Lines(const std::string &text)
+{
+    std::vector<std::string> lines;
+    for (size_t at = 0; at < text.size();) {
+        const size_t end = text.find('\n', at);
+        lines.push_back(text.substr(at, end - at));
+        at = end + 1;
+    }
+    return lines;
+}
+
+std::string ListText()
+{
+    return std::filesystem::exists(kList) ? ReadFile(kList) : "";
+}
+
+// The hosts that a caller of the library finds, "NAME(ADDRESS)", sorted. The daemon is started where none runs.
+std::vector<std::string> Discover(size_t expected, int *result = nullptr)
+{
+    awaited_lines = expected;
+    const int dumped = TAVOFHOSTDumpHost();
+    if (result)
+        *result = dumped;
+    TLIBSZHASH *hosts = PshTLIBSzHashAlloc(1024);
+    std::vector<std::string> keys;
+    if (TAVOFHOSTGet2Hash(&hosts) > 0) {
+        TLIBSZLIST *names = PslTLIBSzListAlloc(1024);
+        TLIBSzHashEnumKey(hosts, &names);
+        for (int i = 0; i < names->nItem; ++i)
+            keys.push_back(SzTLIBSzListGet(names, i));
+        TLIBSzListFree(names);
+    }
+    TLIBSzHashFree(hosts);
+    std::sort(keys.begin(), keys.end());
+    return keys;
+}
+
+class Daemons : public testing::Test {
+  protected:
+    void SetUp() override
+    {
+        if (const std::string missing = VirtualCable::Missing(); !missing.empty())
+            GTEST_SKIP() << missing;
+        if (const char *lacks = std::getenv("TAVO_ROOT_LACKS"); lacks && std::strstr(lacks, "uids"))
+            GTEST_SKIP() << "the daemon has nobody to become";
+        cable_.emplace("cable");
+        for (int i = 0; i < 3; ++i) {
+            Node &node = nodes_[i].emplace("nas" + std::to_string(i + 1));
+            cable_->Plug(node, "eth0");
+            ASSERT_EQ(node.Shell("ifconfig eth0 192.0.2." + std::to_string(i + 1) + " netmask 255.255.255.0 up"), 0);
+        }
+    }
+
+    void StartAll()
+    {
+        for (auto &node : nodes_)
+            ASSERT_EQ(node->Shell(kDaemon), 0);
+    }
+
+    std::optional<VirtualCable> cable_;
+    std::optional<Node> nodes_[3];
+};
+
+TEST_F(Daemons, FindEachOther)
+{
+    for (int i = 1; i < 3; ++i)
+        ASSERT_EQ(nodes_[i]->Shell(kDaemon), 0);
+    EXPECT_TRUE(nodes_[0]->Run([] {
+        EXPECT_THAT(Discover(2), UnorderedElementsAre("nas2(192.0.2.2)", "nas3(192.0.2.3)"));
+        EXPECT_FALSE(std::filesystem::exists(kList)) << "taken";
+        EXPECT_GT(TLIBReadPidFile(kPidFile), 0) << "the library started it";
+        return true;
+    }));
+    // And the others that one, by now; once more and a second time, since each query begins a new list.
+    for (int round = 0; round < 2; ++round) {
+        EXPECT_TRUE(nodes_[1]->Run([] {
+            EXPECT_THAT(Discover(2), UnorderedElementsAre("nas1(192.0.2.1)", "nas3(192.0.2.3)"));
+            return true;
+        }));
+    }
+    // A new name, and one that is switched off.
+    ASSERT_EQ(nodes_[0]->Shell("hostname attic"), 0);
+    ASSERT_EQ(nodes_[2]->Shell("ifconfig eth0 down"), 0);
+    ::usleep(4100000);  // later, it is another query
+    EXPECT_TRUE(nodes_[1]->Run([] {
+        std::filesystem::remove(kList);  // of the second half of the last query
+        EXPECT_THAT(Discover(1), UnorderedElementsAre("attic(192.0.2.1)"));
+        return true;
+    }));
+}
+
+TEST_F(Daemons, AreFoundFromTheInterfacesThatWork)
+{
+    StartAll();
+    VirtualCable second("second");
+    second.Plug(*nodes_[0], "eth1");  // down, without an address
+    EXPECT_TRUE(nodes_[0]->Run([] {
+        EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0x2u);
+        EXPECT_TRUE(Eventually([] { return Lines(ListText()).size() == 2; })) << ListText();
+        EXPECT_THAT(Lines(ListText()), UnorderedElementsAre("6,240,nas2,192.0.2.2,eth0", "6,240,nas3,192.0.2.3,eth0"));
+        int result = 0;
+        EXPECT_THAT(Discover(2, &result), IsEmpty());
+        EXPECT_EQ(result, -1) << "one interface could not send";
+        return true;
+    }));
+}
+
+// What follows looks at the processes of the node in which it runs.
+std::string Status(const std::string &pid, const std::string &field)
+{
+    for (const std::string &line : Lines(ReadFile("/proc/" + pid + "/status"))) {
+        if (line.starts_with(field + ":"))
+            return line.substr(field.size() + 2);
+    }
+    return "";
+}
+
+bool IsGone(const std::string &pid)
+{
+    return Eventually([&] { return !std::filesystem::exists("/proc/" + pid); });
+}
+
+// The two processes of the daemon: who writes and who listens.
+struct Pids {
+    std::string root = ReadFile(kPidFile);
+    std::string listener;
+
+    Pids()
+    {
+        root.resize(root.find('\n'));
+        listener = ReadFile("/proc/" + root + "/task/" + root + "/children");
+        listener.resize(listener.find(' '));
+    }
+};
+
+TEST_F(Daemons, TheListenerHasNoRights)
+{
+    StartAll();
+    EXPECT_TRUE(nodes_[0]->Run([] {
+        const Pids pids;
+        EXPECT_EQ(Status(pids.listener, "Uid"), "65534\t65534\t65534\t65534");
+        EXPECT_EQ(Status(pids.listener, "Gid"), "65534\t65534\t65534\t65534");
+        EXPECT_EQ(Status(pids.listener, "Groups"), " ");
+        for (const char *set : {"CapInh", "CapPrm", "CapEff", "CapAmb"})
+            EXPECT_EQ(Status(pids.listener, set), "0000000000000000") << set;
+        EXPECT_EQ(Status(pids.listener, "NoNewPrivs"), "1");
+        EXPECT_THAT(std::filesystem::read_symlink("/proc/" + pids.listener + "/root").string(), HasSubstr("(deleted)"));
+        // Standard streams, the network, the other part: nothing else is open.
+        size_t sockets = 0;
+        for (const auto &fd : std::filesystem::directory_iterator("/proc/" + pids.listener + "/fd")) {
+            const std::string what = std::filesystem::read_symlink(fd.path());
+            sockets += what.starts_with("socket:");
+            EXPECT_TRUE(what.starts_with("socket:") || std::atoi(fd.path().filename().c_str()) < 3) << what;
+        }
+        EXPECT_EQ(sockets, 2u);
+        // The writer has one, and never hears the network.
+        sockets = 0;
+        for (const auto &fd : std::filesystem::directory_iterator("/proc/" + pids.root + "/fd"))
+            sockets += std::filesystem::read_symlink(fd.path()).string().starts_with("socket:");
+        EXPECT_EQ(sockets, 1u);
+        return true;
+    }));
+}
+
+TEST_F(Daemons, OneEndsWithTheOther)
+{
+    StartAll();
+    EXPECT_TRUE(nodes_[0]->Run([] {
+        const Pids first;
+        EXPECT_NE(ShellStatus(std::string(kDaemon) + " 2>/dev/null"), 0) << "one is enough";
+        EXPECT_EQ(::kill(std::atoi(first.root.c_str()), SIGTERM), 0);
+        EXPECT_TRUE(IsGone(first.root) && IsGone(first.listener));
+        EXPECT_FALSE(std::filesystem::exists(kPidFile));
+
+        EXPECT_EQ(ShellStatus(kDaemon), 0);
+        const Pids second;
+        EXPECT_EQ(::kill(std::atoi(second.listener.c_str()), SIGKILL), 0);
+        EXPECT_TRUE(IsGone(second.root));
+        EXPECT_FALSE(std::filesystem::exists(kPidFile));
+
+        EXPECT_EQ(ShellStatus(kDaemon), 0);
+        const Pids third;
+        EXPECT_EQ(::kill(std::atoi(third.root.c_str()), SIGKILL), 0);
+        EXPECT_TRUE(IsGone(third.root) && IsGone(third.listener));
+        EXPECT_EQ(ShellStatus(kDaemon), 0) << "what a crash left is in nobody's way";
+        return true;
+    }));
+}
+
+class UdpSocket {
+  public:
+    explicit UdpSocket(uint16_t port = 0)
+    {
+        const int on = 1;
+        ::setsockopt(fd_, SOL_SOCKET, SO_BROADCAST, &on, sizeof on);
+        const sockaddr_in here = Address("0.0.0.0", port);
+        EXPECT_EQ(::bind(fd_, reinterpret_cast<const sockaddr *>(&here), sizeof here), 0);
+    }
+    ~UdpSocket() { ::close(fd_); }
+
+    void Send(const char *to, std::string_view bytes) const
+    {
+        const sockaddr_in where = Address(to, findhostd::kPort);
+        ::sendto(fd_, bytes.data(), bytes.size(), 0, reinterpret_cast<const sockaddr *>(&where), sizeof where);
+    }
+
+    // How many packets come until none has for half a second.
+    size_t Count() const
+    {
+        const timeval patience = {0, 500000};
+        ::setsockopt(fd_, SOL_SOCKET, SO_RCVTIMEO, &patience, sizeof patience);
+        char bytes[600];
+        size_t count = 0;
+        while (::recv(fd_, bytes, sizeof bytes, 0) >= 0)
+            ++count;
+        return count;
+    }
+
+  private:
+    static sockaddr_in Address(const char *address, uint16_t port)
+    {
+        sockaddr_in where{};
+        where.sin_family = AF_INET;
+        where.sin_addr.s_addr = ::inet_addr(address);
+        where.sin_port = htons(port);
+        return where;
+    }
+
+    const int fd_ = ::socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0);
+};
+
+std::string Reply(const char *address, const std::string &name)
+{
+    findhostd::Host host{};
+    host.model = 7;
+    host.protocol = 250;
+    host.address.s_addr = ::inet_addr(address);
+    name.copy(host.name, findhostd::kLongestName);
+    std::array<uint8_t, findhostd::kLargestPacket> packet;
+    return {reinterpret_cast<const char *>(packet.data()), findhostd::WriteReply(host, packet)};
+}
+
+TEST_F(Daemons, HostileRepliesChangeNothing)
+{
+    ASSERT_EQ(nodes_[0]->Shell(kDaemon), 0);
+    ASSERT_EQ(nodes_[1]->Shell(kDaemon), 0);
+    const Node &attacker = *nodes_[2];
+    EXPECT_TRUE(attacker.Run([] {
+        UdpSocket().Send("192.0.2.1", Reply("192.0.2.3", "unasked"));
+        return true;
+    }));
+    EXPECT_TRUE(nodes_[0]->Run([] {
+        EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u);
+        EXPECT_TRUE(Eventually([] { return Lines(ListText()).size() == 1; })) << ListText();
+        return true;
+    }));
+    EXPECT_TRUE(attacker.Run([] {
+        const UdpSocket socket;
+        const std::string good = Reply("192.0.2.3", "mallory");
+        std::srand(1);
+        for (int i = 0; i < 3000; ++i) {
+            std::string bytes = i % 3 ? good : Reply("192.0.2.2", "stolen");
+            if (i % 3 == 1)
+                bytes.resize(static_cast<size_t>(std::rand()) % good.size());
+            else if (i % 3 == 2)
+                for (char &byte : bytes)
+                    byte = std::rand() % 4 ? byte : static_cast<char>(std::rand());
+            if (i % 3 == 2)
+                std::memcpy(bytes.data() + bytes.size() - 4, "\x09\x09\x09\x09", 4);  // never its own address
+            socket.Send("192.0.2.1", bytes);
+        }
+        socket.Send("192.0.2.1", std::string(60000, 'x'));
+        socket.Send("192.0.2.1", "");
+        socket.Send("192.0.2.1", good);  // the last one: when it is there, all the others have been seen
+        return true;
+    }));
+    EXPECT_TRUE(nodes_[0]->Run([] {
+        EXPECT_TRUE(Eventually([] { return Lines(ListText()).size() == 2; })) << ListText();
+        EXPECT_THAT(Lines(ListText()),
+                    UnorderedElementsAre("6,240,nas2,192.0.2.2,eth0", "7,250,mallory,192.0.2.3,eth0"));
+        struct stat st;
+        EXPECT_EQ(::stat(kList, &st), 0);
+        EXPECT_EQ(st.st_uid, 0u);
+        EXPECT_EQ(st.st_mode & 07777, 0644u);
+        EXPECT_LT(std::atoi(Status(Pids().listener, "VmData").c_str()), 16384) << "kB";
+        return true;
+    }));
+}
+
+TEST_F(Daemons, NobodyIsFloodedOnSomebodysBehalf)
+{
+    ASSERT_EQ(nodes_[0]->Shell(kDaemon), 0);
+    const std::string query(reinterpret_cast<const char *>(stFHOSTBroadCast), sizeof stFHOSTBroadCast);
+    EXPECT_TRUE(nodes_[1]->Run([&] {
+        const UdpSocket socket(findhostd::kPort);
+        socket.Send("192.0.2.1", query);
+        EXPECT_EQ(socket.Count(), 1u);
+        for (int i = 0; i < 2000; ++i)
+            socket.Send("192.0.2.1", query);
+        const size_t answers = socket.Count();
+        EXPECT_GE(answers, 1u);
+        EXPECT_LE(answers, 500u) << "50 a second, for as long as it takes to send";
+        return true;
+    }));
+    // An asker whose address is not of this network.
+    ASSERT_EQ(nodes_[2]->Shell("ifconfig eth0 198.51.100.3 netmask 255.255.255.0 && route add default dev eth0"), 0);
+    ASSERT_EQ(nodes_[0]->Shell("route add default dev eth0"), 0);
+    EXPECT_TRUE(nodes_[2]->Run([&] {
+        const UdpSocket socket(findhostd::kPort);
+        socket.Send("192.0.2.1", query);
+        EXPECT_EQ(socket.Count(), 0u);
+        return true;
+    }));
+}
+
+TEST_F(Daemons, WhatStandsInTheListsPlaceIsReplaced)
+{
+    StartAll();
+    EXPECT_TRUE(nodes_[0]->Run([] {
+        WriteFile("/tmp/victim", "root:x\n");
+        std::filesystem::create_symlink("/tmp/victim", kList);
+        EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u);
+        EXPECT_TRUE(Eventually([] { return Lines(ListText()).size() == 2; })) << ListText();
+        EXPECT_FALSE(std::filesystem::is_symlink(kList));
+        EXPECT_EQ(ReadFile("/tmp/victim"), "root:x\n");
+        for (const auto &entry : std::filesystem::directory_iterator("/tmp"))
+            EXPECT_FALSE(entry.path().filename().string().starts_with(".tavods")) << entry.path();
+        return true;
+    }));
+}
+
+}  // namespace
+
+// The library's waiting: not for the daemon, which is ready when its start is over, and for answers until they are there.
+extern "C" unsigned sleep(unsigned seconds)
+{
+    for (int i = 0; seconds >= 10 && i < 2000 && Lines(ListText()).size() < awaited_lines; ++i)
+        ::usleep(10000);
+    return 0;
+}

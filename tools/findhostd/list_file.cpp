@@ -1,0 +1,49 @@
+// The list of hosts, /tmp/tavods.list.
+#include "list_file.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace findhostd {
+namespace {
+
+constexpr const char *kList = "/tmp/tavods.list";
+
+bool WriteAll(int fd, std::string_view text)
+{
+    while (!text.empty()) {
+        const ssize_t put = ::write(fd, text.data(), text.size());
+        if (put < 0 && errno == EINTR)
+            continue;
+        if (put < 0)
+            return false;
+        text.remove_prefix(static_cast<size_t>(put));
+    }
+    return true;
+}
+
+}  // namespace
+
+bool WriteList(std::string_view text)
+{
+    // A file of our own, made where nothing was; the rename takes away a link, or another's file, without following it.
+    char temp[] = "/tmp/.tavods.list.XXXXXX";
+    const int fd = ::mkostemp(temp, O_CLOEXEC);
+    if (fd < 0)
+        return false;
+    const bool written = WriteAll(fd, text) && ::fchmod(fd, 0644) == 0;
+    const bool done = ::close(fd) == 0 && written && std::rename(temp, kList) == 0;
+    if (!done) {
+        const int error = errno;
+        ::unlink(temp);
+        errno = error;
+    }
+    return done;
+}
+
+}  // namespace findhostd

@@ -1,0 +1,209 @@
+// The part of the daemon that listens to the network.
+#include "network_part.h"
+
+#include "own_addresses.h"
+#include "packet.h"
+#include "report.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <cstring>
+#include <ctime>
+
+#include <arpa/inet.h>
+#include <poll.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+namespace findhostd {
+namespace {
+
+constexpr int kAnswersASecond = 50;
+constexpr time_t kCollectSeconds = 15;  // after a query of ours; what comes later, or unasked, is not listed
+constexpr time_t kSameQuery = 3;        // a query goes out twice, and from every interface
+
+time_t Now()
+{
+    timespec now{};
+    ::clock_gettime(CLOCK_MONOTONIC, &now);
+    return now.tv_sec;
+}
+
+struct Packet {
+    std::array<uint8_t, kLargestPacket + 1> bytes;  // one more than any packet of ours has: too large is seen
+    size_t size;
+    in_addr from;
+    unsigned interface;
+};
+
+bool Receive(int network, Packet &packet)
+{
+    sockaddr_in from{};
+    iovec part = {packet.bytes.data(), packet.bytes.size()};
+    alignas(cmsghdr) char control[CMSG_SPACE(sizeof(in_pktinfo))];
+    msghdr message{};
+    message.msg_name = &from;
+    message.msg_namelen = sizeof from;
+    message.msg_iov = &part;
+    message.msg_iovlen = 1;
+    message.msg_control = control;
+    message.msg_controllen = sizeof control;
+    const ssize_t size = ::recvmsg(network, &message, MSG_DONTWAIT);
+    if (size < 0 || from.sin_family != AF_INET)
+        return false;
+    packet.size = static_cast<size_t>(size);
+    packet.from = from.sin_addr;
+    packet.interface = 0;
+    for (cmsghdr *part_of = CMSG_FIRSTHDR(&message); part_of; part_of = CMSG_NXTHDR(&message, part_of)) {
+        if (part_of->cmsg_level != IPPROTO_IP || part_of->cmsg_type != IP_PKTINFO)
+            continue;
+        in_pktinfo info;
+        std::memcpy(&info, CMSG_DATA(part_of), sizeof info);
+        packet.interface = static_cast<unsigned>(info.ipi_ifindex);
+    }
+    return true;
+}
+
+// To the asker's daemon, out of the interface on which the question came and from the address there.
+void Send(int network, std::span<const uint8_t> bytes, in_addr to, unsigned interface, in_addr from)
+{
+    sockaddr_in where{};
+    where.sin_family = AF_INET;
+    where.sin_addr = to;
+    where.sin_port = htons(kPort);
+    iovec part = {const_cast<uint8_t *>(bytes.data()), bytes.size()};
+    alignas(cmsghdr) char control[CMSG_SPACE(sizeof(in_pktinfo))] = {};
+    msghdr message{};
+    message.msg_name = &where;
+    message.msg_namelen = sizeof where;
+    message.msg_iov = &part;
+    message.msg_iovlen = 1;
+    message.msg_control = control;
+    message.msg_controllen = sizeof control;
+    cmsghdr *const head = CMSG_FIRSTHDR(&message);
+    head->cmsg_level = IPPROTO_IP;
+    head->cmsg_type = IP_PKTINFO;
+    head->cmsg_len = CMSG_LEN(sizeof(in_pktinfo));
+    in_pktinfo info{};
+    info.ipi_ifindex = static_cast<int>(interface);
+    info.ipi_spec_dst = from;
+    std::memcpy(CMSG_DATA(head), &info, sizeof info);
+    ::sendmsg(network, &message, MSG_DONTWAIT | MSG_NOSIGNAL);
+}
+
+// The name as it is now. One that a list cannot hold is no name.
+void PutOwnName(Host &host)
+{
+    char name[256] = "";
+    ::gethostname(name, sizeof name - 1);
+    const std::string_view known = IsHostName(name) ? name : "appliance";
+    known.copy(host.name, kLongestName);
+}
+
+class Listener {
+  public:
+    Listener(int network, int reports, uint32_t model) : network_(network), reports_(reports), model_(model) {}
+
+    void Handle(const Packet &packet)
+    {
+        Host host{};
+        switch (ReadPacket({packet.bytes.data(), packet.size}, host)) {
+        case PacketKind::query:
+            addresses_.Refresh();
+            if (addresses_.Has(packet.from))
+                NoteOwnQuery();
+            else
+                Answer(packet);
+            break;
+        case PacketKind::reply:
+            // Each speaks for itself alone: nobody can put another's address into the list.
+            if (host.address.s_addr == packet.from.s_addr && asked_ >= 0 && Now() - asked_ <= kCollectSeconds)
+                Tell({Report::host_found, packet.interface, host});
+            break;
+        case PacketKind::other:
+            break;
+        }
+    }
+
+  private:
+    void NoteOwnQuery()
+    {
+        const time_t now = Now();
+        const bool same = asked_ >= 0 && now - asked_ <= kSameQuery;
+        Tell({same ? Report::query_again : Report::query_sent, 0, {}});
+        asked_ = now;
+    }
+
+    void Answer(const Packet &packet)
+    {
+        // An asker from elsewhere may be a forged address, whom we would flood on somebody's behalf.
+        const in_addr *const own = addresses_.Near(packet.interface, packet.from);
+        if (!own || !MayAnswer())
+            return;
+        Host self{};
+        self.model = model_;
+        self.protocol = kProtocol;
+        self.address = *own;
+        PutOwnName(self);
+        std::array<uint8_t, kLargestPacket> bytes;
+        const size_t size = WriteReply(self, bytes);
+        Send(network_, {bytes.data(), size}, packet.from, packet.interface, *own);
+    }
+
+    bool MayAnswer()
+    {
+        if (const time_t now = Now(); now != second_) {
+            second_ = now;
+            answered_ = 0;
+        }
+        return answered_++ < kAnswersASecond;
+    }
+
+    // What the other part has no room for is lost: it is asked again soon.
+    void Tell(const Report &report) { ::send(reports_, &report, sizeof report, MSG_DONTWAIT | MSG_NOSIGNAL); }
+
+    int network_;
+    int reports_;
+    uint32_t model_;
+    OwnAddresses addresses_;
+    time_t asked_ = -1;
+    time_t second_ = -1;
+    int answered_ = 0;
+};
+
+}  // namespace
+
+int OpenNetworkSocket()
+{
+    const int fd = ::socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
+    if (fd < 0)
+        return -1;
+    const int on = 1;
+    sockaddr_in everywhere{};
+    everywhere.sin_family = AF_INET;
+    everywhere.sin_port = htons(kPort);
+    if (::setsockopt(fd, IPPROTO_IP, IP_PKTINFO, &on, sizeof on) == 0 &&
+        ::bind(fd, reinterpret_cast<const sockaddr *>(&everywhere), sizeof everywhere) == 0)
+        return fd;
+    const int error = errno;
+    ::close(fd);
+    errno = error;
+    return -1;
+}
+
+void ListenToNetwork(int network, int reports, uint32_t model)
+{
+    Listener listener(network, reports, model);
+    Packet packet;
+    for (;;) {
+        pollfd ends[] = {{network, POLLIN, 0}, {reports, POLLIN, 0}};
+        if (::poll(ends, 2, -1) < 0 && errno != EINTR)
+            return;
+        if (ends[1].revents)
+            return;  // it never says anything: its end is gone
+        if (ends[0].revents && Receive(network, packet))
+            listener.Handle(packet);
+    }
+}
+
+}  // namespace findhostd

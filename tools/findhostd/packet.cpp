@@ -1,0 +1,173 @@
+// The discovery packets: what is asked on the network and what is answered.
+#include "packet.h"
+
+#include "tavo_fhost.h"
+
+#include <algorithm>
+#include <cstring>
+#include <iterator>
+
+namespace findhostd {
+namespace {
+
+// After the header come records: a type, a length, that many bytes. Types that are not listed here are skipped.
+enum Record : uint8_t {
+    record_old_query = 0x00,  // empty
+    record_kind = 0x01,
+    record_model = 0x10,
+    record_protocol = 0x11,
+    record_name = 0x12,
+    record_address = 0x13,
+};
+
+constexpr uint32_t kKindQuery = 1;
+constexpr uint32_t kKindReply = 2;
+
+// Numbers are little-endian, as in the queries.
+uint32_t ReadNumber(const uint8_t *bytes) noexcept
+{
+    return uint32_t{bytes[0]} | uint32_t{bytes[1]} << 8 | uint32_t{bytes[2]} << 16 | uint32_t{bytes[3]} << 24;
+}
+
+struct Found {
+    bool old_query = false;
+    uint32_t kind = 0;
+    unsigned seen = 0;  // a bit for each of the types 0x10 to 0x13
+    Host host{};
+};
+
+bool TakeNumber(std::span<const uint8_t> value, uint32_t &number) noexcept
+{
+    if (value.size() != 4)
+        return false;
+    number = ReadNumber(value.data());
+    return true;
+}
+
+bool TakeName(std::span<const uint8_t> value, Host &host) noexcept
+{
+    if (!IsHostName({reinterpret_cast<const char *>(value.data()), value.size()}))
+        return false;
+    std::memcpy(host.name, value.data(), value.size());
+    return true;
+}
+
+bool TakeAddress(std::span<const uint8_t> value, Host &host) noexcept
+{
+    if (value.size() != sizeof host.address)
+        return false;
+    std::memcpy(&host.address, value.data(), sizeof host.address);
+    return true;
+}
+
+// False for a record that is not what its type says, or is there a second time.
+bool TakeRecord(uint8_t type, std::span<const uint8_t> value, Found &found) noexcept
+{
+    if (type >= record_model && type <= record_address) {
+        const unsigned bit = 1u << (type - record_model);
+        if (found.seen & bit)
+            return false;
+        found.seen |= bit;
+    }
+    switch (type) {
+    case record_old_query:
+        found.old_query = true;
+        return value.empty();
+    case record_kind:
+        return found.kind == 0 && TakeNumber(value, found.kind) && found.kind != 0;
+    case record_model:
+        return TakeNumber(value, found.host.model);
+    case record_protocol:
+        return TakeNumber(value, found.host.protocol);
+    case record_name:
+        return TakeName(value, found.host);
+    case record_address:
+        return TakeAddress(value, found.host);
+    default:
+        return true;
+    }
+}
+
+class Writer {
+  public:
+    explicit Writer(std::array<uint8_t, kLargestPacket> &packet) : packet_(packet) {}
+
+    void Bytes(const void *bytes, size_t size)
+    {
+        std::memcpy(packet_.data() + size_, bytes, size);
+        size_ += size;
+    }
+    void Put(uint8_t type, const void *value, size_t size)
+    {
+        const uint8_t head[] = {type, static_cast<uint8_t>(size)};
+        Bytes(head, sizeof head);
+        Bytes(value, size);
+    }
+    void Put(uint8_t type, uint32_t number)
+    {
+        const uint8_t bytes[] = {static_cast<uint8_t>(number), static_cast<uint8_t>(number >> 8),
+                                 static_cast<uint8_t>(number >> 16), static_cast<uint8_t>(number >> 24)};
+        Put(type, bytes, sizeof bytes);
+    }
+    size_t Size() const { return size_; }
+
+  private:
+    std::array<uint8_t, kLargestPacket> &packet_;
+    size_t size_ = 0;
+};
+
+// All records together are far from filling a packet.
+static_assert(sizeof stFHOSTHeader + 3 * 6 + 6 + 2 + kLongestName <= kLargestPacket);
+
+}  // namespace
+
+bool IsHostName(std::string_view name) noexcept
+{
+    return !name.empty() && name.size() <= kLongestName && name.front() != ' ' && name.back() != ' ' &&
+           std::all_of(name.begin(), name.end(), [](char byte) {
+               const auto value = static_cast<unsigned char>(byte);
+               return value >= 0x20 && value != 0x7F && byte != ',';
+           });
+}
+
+bool IsSound(const Host &host) noexcept
+{
+    const char *const end = std::find(host.name, std::end(host.name), '\0');
+    const uint32_t address = ntohl(host.address.s_addr);
+    const uint32_t first = address >> 24;
+    return host.model != 0 && host.protocol >= kProtocol && end != std::end(host.name) &&
+           IsHostName({host.name, static_cast<size_t>(end - host.name)}) && first != 0 && first != 127 && first <= 223;
+}
+
+PacketKind ReadPacket(std::span<const uint8_t> packet, Host &host) noexcept
+{
+    if (packet.size() > kLargestPacket || packet.size() < sizeof stFHOSTHeader ||
+        std::memcmp(packet.data(), stFHOSTHeader, sizeof stFHOSTHeader) != 0)
+        return PacketKind::other;
+    Found found;
+    for (auto rest = packet.subspan(sizeof stFHOSTHeader); !rest.empty();) {
+        if (rest.size() < 2 || rest.size() - 2 < rest[1] || !TakeRecord(rest[0], rest.subspan(2, rest[1]), found))
+            return PacketKind::other;
+        rest = rest.subspan(size_t{2} + rest[1]);
+    }
+    if (found.kind == kKindQuery || (found.kind == 0 && found.old_query))
+        return PacketKind::query;
+    if (found.kind != kKindReply || found.seen != 0xF || !IsSound(found.host))
+        return PacketKind::other;
+    host = found.host;
+    return PacketKind::reply;
+}
+
+size_t WriteReply(const Host &host, std::array<uint8_t, kLargestPacket> &packet) noexcept
+{
+    Writer writer(packet);
+    writer.Bytes(stFHOSTHeader, sizeof stFHOSTHeader);
+    writer.Put(record_kind, kKindReply);
+    writer.Put(record_model, host.model);
+    writer.Put(record_protocol, host.protocol);
+    writer.Put(record_name, host.name, std::strlen(host.name));
+    writer.Put(record_address, &host.address, sizeof host.address);
+    return writer.Size();
+}
+
+}  // namespace findhostd

@@ -1,0 +1,44 @@
+// The discovery packets: what is asked on the network and what is answered. docs/discovery.md has the bytes.
+#ifndef FINDHOSTD_PACKET_H
+#define FINDHOSTD_PACKET_H
+
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <span>
+#include <string_view>
+
+#include <netinet/in.h>
+
+namespace findhostd {
+
+inline constexpr uint16_t kPort = 9999;
+inline constexpr size_t kLargestPacket = 512;
+inline constexpr size_t kLongestName = 63;
+inline constexpr uint32_t kProtocol = 240;  // ours, and the least that a list has room for
+
+// An appliance as it describes itself. No pointers: it goes over a socket as it is.
+struct Host {
+    uint32_t model;
+    uint32_t protocol;
+    in_addr address;
+    char name[kLongestName + 1];  // ends in a NUL; the bytes behind it are 0
+};
+
+// A name that a line of the list can hold: 1 to 63 bytes, no control characters, no comma, no blank at either end.
+bool IsHostName(std::string_view name) noexcept;
+
+// What can stand in the list: a model, a protocol of 240 or more, a name, an address that a host can have.
+bool IsSound(const Host &host) noexcept;
+
+enum class PacketKind { other, query, reply };
+
+// What the packet is. Of a reply, `host` is filled in, and sound; else it is left alone.
+PacketKind ReadPacket(std::span<const uint8_t> packet, Host &host) noexcept;
+
+// The reply of a sound host; returns its size.
+size_t WriteReply(const Host &host, std::array<uint8_t, kLargestPacket> &packet) noexcept;
+
+}  // namespace findhostd
+
+#endif
