@@ -23,6 +23,10 @@ if(TAVO_SANITIZE)
     target_compile_options(tavo_rules INTERFACE -fsanitize=address,undefined -fno-sanitize-recover=undefined
                                                 -fno-omit-frame-pointer)
     target_link_options(tavo_rules INTERFACE -fsanitize=address,undefined)
+elseif(TAVO_FUZZ)
+    target_compile_options(tavo_rules INTERFACE -fsanitize=fuzzer-no-link,address,undefined -fno-sanitize-recover=all
+                                                -fno-omit-frame-pointer)
+    target_link_options(tavo_rules INTERFACE -fsanitize=address,undefined)
 else()
     target_compile_options(tavo_rules INTERFACE "$<$<NOT:$<CONFIG:Debug>>:-U_FORTIFY_SOURCE;-D_FORTIFY_SOURCE=2>")
 endif()

@@ -10,16 +10,16 @@
 
 namespace machine {
 
-Channel::Channel(const char *path) : descriptor(open(path, O_RDWR | O_CLOEXEC))
+Channel::Channel(const char *path) : descriptor_(open(path, O_RDWR | O_CLOEXEC))
 {
-    if (descriptor < 0)
+    if (descriptor_ < 0)
         throw std::system_error(errno, std::generic_category(), path);
 }
 
 void Channel::ReceiveExactly(char *into, size_t size) const
 {
     while (size > 0) {
-        const ssize_t got = read(descriptor, into, size);
+        const ssize_t got = read(descriptor_, into, size);
         if (got > 0) {
             into += got;
             size -= static_cast<size_t>(got);
@@ -34,7 +34,7 @@ void Channel::ReceiveExactly(char *into, size_t size) const
 void Channel::SendExactly(const char *from, size_t size) const
 {
     while (size > 0) {
-        const ssize_t put = write(descriptor, from, size);
+        const ssize_t put = write(descriptor_, from, size);
         if (put > 0) {
             from += put;
             size -= static_cast<size_t>(put);

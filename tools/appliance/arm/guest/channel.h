@@ -15,7 +15,7 @@ struct Frame {
 class Channel {
   public:
     explicit Channel(const char *path);
-    [[nodiscard]] int Descriptor() const { return descriptor; }
+    [[nodiscard]] int Descriptor() const { return descriptor_; }
     // Waits for the host, also through the time in which none is connected.
     Frame Receive() const;
     void Send(char type, std::string_view payload) const;
@@ -23,7 +23,7 @@ class Channel {
   private:
     void ReceiveExactly(char *into, size_t size) const;
     void SendExactly(const char *from, size_t size) const;
-    int descriptor;
+    int descriptor_;
 };
 
 }  // namespace machine
