@@ -5,8 +5,11 @@
 
 #include "appliance/detail/daemon_signal.h"
 #include "core/detail/fault.h"
+#include "core/detail/keep_fault.h"
 
 #include <csignal>
+
+#include <unistd.h>
 
 namespace {
 
@@ -17,14 +20,26 @@ constexpr const char *kPidFile = "/var/run/rsyncd.pid";
 constexpr const char *kServer = "/usr/bin/rsync";
 constexpr const char *kOptions = "--config=/usr/tavo/etc/rsyncd.conf";
 
-// A server that does not run is stopped.
+constexpr int kStopMilliseconds = 5000;
+constexpr int kLookMilliseconds = 20;
+
+// A server that does not run is stopped. One that runs is waited for: a new one refuses to start beside it.
 bool Stop()
 {
-    return tavo::SignalDaemon(kPidFile, SIGTERM);
+    if (!tavo::SignalDaemon(kPidFile, SIGTERM))
+        return false;
+    const tavo::KeepFault keep;
+    for (int waited = 0; TLIBProcAliveByPidFile(kPidFile); waited += kLookMilliseconds) {
+        if (waited >= kStopMilliseconds)
+            return false;
+        ::usleep(kLookMilliseconds * 1000);
+    }
+    return true;
 }
 
 bool Start()
 {
+    const tavo::KeepFault keep;
     return TLIBProcAliveByPidFile(kPidFile) || TLIBExec(kServer, "--daemon", kOptions, nullptr) == 0;
 }
 

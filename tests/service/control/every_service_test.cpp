@@ -1,0 +1,472 @@
+// Every service through every action, and with daemons that behave in every way: the key, the links, the share records,
+// the scripts in their order and the processes are what they must be.
+#include "tavo_service.h"
+
+#include "service_root.h"
+
+#include "support/fault_state.h"
+#include "support/scratch_dir.h"
+
+#include <gmock/gmock.h>
+
+#include <algorithm>
+#include <map>
+#include <string>
+#include <vector>
+
+using test::DaemonPid;
+using test::Fault;
+using test::HasEnded;
+using test::IsUp;
+using test::LastFault;
+using test::LinkTarget;
+using test::ScriptCalls;
+using test::Setting;
+using test::Soon;
+using test::WriteFile;
+using testing::IsEmpty;
+using testing::MatchesRegex;
+
+namespace {
+
+using Texts = std::vector<std::string>;
+
+// What an action of a service comes to when one of its daemons does not do as it is told.
+enum Outcome { done = 0, failed = -1 };
+
+struct Row {
+    int id;
+    Texts start, stop, restart;  // the scripts that run
+    Texts daemons;               // that run when it is started
+    Texts staying;               // and those of them that a stop leaves; also others that it starts
+    bool on_when_stopped;        // the status of a service that is enabled and stopped
+    const char *daemon;          // the one that misbehaves; NULL: there is none
+    Outcome dies, stubborn;      // starting when it dies at once; stopping when it does not end
+    bool has_pid_file;           // the status looks there
+};
+
+void PrintTo(const Row &row, std::ostream *out)
+{
+    *out << row.id;
+}
+
+Texts Scripts(const Texts &names, const char *word)
+{
+    Texts calls;
+    for (const std::string &name : names)
+        calls.push_back(name + ".sh " + word);
+    return calls;
+}
+
+// A service that is one script with one daemon.
+Row Plain(int id, const std::string &script, const char *daemon, Outcome failure, bool has_pid_file)
+{
+    return {id,
+            Scripts({script}, "start"),
+            Scripts({script}, "stop"),
+            Scripts({script}, "restart"),
+            {daemon},
+            {},
+            false,
+            daemon,
+            failure,
+            failure,
+            has_pid_file};
+}
+
+// One that is its key and its data folder alone.
+Row Bare(int id)
+{
+    return {id, {}, {}, {}, {}, {}, true, nullptr, done, done, false};
+}
+
+Texts Reversed(Texts texts)
+{
+    std::reverse(texts.begin(), texts.end());
+    return texts;
+}
+
+Texts Joined(Texts left, const Texts &right)
+{
+    left.insert(left.end(), right.begin(), right.end());
+    return left;
+}
+
+const Texts on_database = {"S82surveillance", "S99iTunes", "S86tavodms", "S66tavoindexd", "S25download", "S23tavologd"};
+
+// Scripts of a service without daemon bits: only one that could not be run is a failure.
+const Row rows[] = {
+    Plain(0, "S97apache-user", "httpd-user", failed, true),
+    Bare(1),
+    {2, {}, {}, {}, {"rsyncd"}, {}, false, "rsyncd", failed, failed, true},
+    Plain(3, "S25download", "scheduler", failed, true),
+    Plain(4, "S86tavodms", "dms", failed, true),
+    {5,
+     {"S96tavorcd.sh start", "S96tavoaudiod.sh start", "S66tavoindexd.sh restart"},
+     {"S96tavorcd.sh stop", "S96tavoaudiod.sh stop", "S66tavoindexd.sh restart"},
+     {"S96tavorcd.sh restart", "S96tavoaudiod.sh restart", "S66tavoindexd.sh restart"},
+     {"tavorcd", "tavoaudiod"},
+     {"tavoindexd"},
+     false,
+     "tavoaudiod",
+     done,  // the other of its two daemons is there
+     done,
+     true},
+    {6,
+     {"S99iTunes.sh start", "S66tavoindexd.sh restart"},
+     {"S99iTunes.sh stop", "S66tavoindexd.sh restart"},
+     {"S99iTunes.sh restart", "S66tavoindexd.sh restart"},
+     {"mt-daapd"},
+     {"tavoindexd"},
+     false,
+     "mt-daapd",
+     failed,
+     failed,
+     true},
+    Plain(7, "S21mysql", "mysqld", done, true),
+    Plain(8, "S20pgsql", "postgres", done, true),
+    Plain(9, "S55lpd", "lpd", failed, false),
+    {10,
+     {"S82surveillance.sh start"},
+     {"S82surveillance.sh stop"},
+     {"S82surveillance.sh restart"},
+     {"ssd"},
+     {},
+     true,  // nothing says which process it is
+     "ssd",
+     failed,
+     failed,
+     false},
+    Bare(11),
+    {12,
+     {"S99ftpd.sh start"},
+     {},  // by its name: the script would wait for open transfers
+     {"S99ftpd.sh restart"},
+     {"ftpd"},
+     {},
+     false,
+     "ftpd",
+     failed,
+     done,  // the signal was sent
+     false},
+    {13,
+     {"S03inetd.sh restart"},
+     {"S03inetd.sh restart"},
+     {"S03inetd.sh restart"},
+     {"inetd"},
+     {"inetd"},
+     true,
+     "inetd",
+     done,
+     done,
+     false},
+    Plain(14, "S95sshd", "sshd", done, true),
+    Plain(15, "S83nfsd", "nfsd", failed, false),
+    {16,
+     {"S81atalk.sh start"},
+     {"S81atalk.sh stop"},
+     {"S81atalk.sh restart"},
+     {"afpd", "papd"},
+     {},
+     false,
+     "afpd",
+     failed,
+     failed,
+     true},
+    {17,
+     {"S80samba.sh start"},
+     {"S80samba.sh stop"},
+     {"S80samba.sh restart"},
+     {"smbd", "nmbd"},
+     {},
+     false,
+     "smbd",
+     done,
+     done,
+     true},
+    Bare(18),
+    {19,
+     {"S97apache-sys.sh restart"},
+     {"S97apache-sys.sh restart"},
+     {"S97apache-sys.sh restart"},
+     {"httpd-sys"},
+     {"httpd-sys"},
+     true,
+     "httpd-sys",
+     failed,
+     failed,
+     false},
+    Plain(20, "S78iscsitrg", "iscsi_trgt", failed, true),
+    Plain(21, "S04crond", "crond", failed, false),
+    {22,
+     Joined({"S21mysql.sh start", "S20pgsql.sh start"}, Reversed(Scripts(on_database, "start"))),
+     Joined(Scripts(on_database, "stop"), {"S20pgsql.sh stop", "S21mysql.sh stop"}),
+     Joined(Joined(Scripts(on_database, "stop"), {"S20pgsql.sh restart", "S21mysql.sh restart"}),
+            Reversed(Scripts(on_database, "start"))),
+     {"mysqld", "postgres", "tavologd", "scheduler", "tavoindexd", "dms", "mt-daapd", "ssd"},
+     {},
+     false,
+     "dms",
+     failed,
+     failed,
+     false},
+    Plain(23, "S77tavomkthumbd", "mkthumbd", failed, true),
+    Plain(24, "S66tavoindexd", "tavoindexd", failed, true),
+    Plain(25, "S88tavomkflvd", "tavomkflvd", failed, true),
+    {26, {}, {}, {}, {}, {}, false, nullptr, failed, failed, false},
+    Plain(27, "S99mDNS", "mDNSResponder", failed, true),
+    Plain(28, "S96tavorcd", "tavorcd", failed, true),
+    Plain(29, "S23tavologd", "tavologd", failed, true),
+};
+
+constexpr int kDatabases = 22;
+constexpr int kRestore = 26;
+
+class Every : public test::Services, public testing::WithParamInterface<Row> {
+  protected:
+    void SetUp() override
+    {
+        Services::SetUp();
+        if (IsSkipped())
+            return;
+        // The spooler's folder is bound when the first printer is shared.
+        if (row.id == 9) {
+            ASSERT_EQ(TAVOServiceSet(8, "/volume2"), 0);
+        }
+    }
+
+    void TearDown() override
+    {
+        if (IsSkipped())
+            return;
+        for (const int32_t *share = TAVOServiceShareIDGet(row.id); *share != TAVO_SERVICE_SHARE_END; ++share)
+            TAVOServiceRemove(*share, 1);
+        if (key)
+            TAVOServiceActionSet(row.id, TAVO_SERVICE_KEY_NO);
+        Services::TearDown();
+    }
+
+    int Act(int action) const { return TAVOServiceActionSet(row.id, action); }
+
+    // The stack of databases is several services and no one's status.
+    bool IsOn() const { return row.id == kDatabases || IsUp(row.id); }
+
+    void ExpectBound(bool bound) const
+    {
+        for (const int32_t *id = TAVOServiceShareIDGet(row.id); *id != TAVO_SERVICE_SHARE_END; ++id) {
+            TAVOSERVICESHARE share;
+            ASSERT_EQ(TAVOServiceSettingGet(*id, &share), bound);
+            const std::string folder = std::string("/volume2/") + share.szShareName;
+            EXPECT_EQ(LinkTarget(share.szLink), bound ? folder : "");
+            EXPECT_TRUE(std::filesystem::is_directory(folder)) << "data is never deleted unasked";
+            char volume[52];
+            EXPECT_EQ(TAVOServiceVolumeGetbyShare(share.szShareName, volume, sizeof volume), bound ? 9 : 0);
+        }
+    }
+
+    void ExpectRunning() const
+    {
+        for (const std::string &daemon : row.daemons)
+            EXPECT_TRUE(test::Runs(daemon)) << daemon;
+    }
+
+    void ExpectStopped() const
+    {
+        for (const std::string &daemon : row.daemons) {
+            if (std::find(row.staying.begin(), row.staying.end(), daemon) == row.staying.end()) {
+                EXPECT_TRUE(HasEnded(daemon)) << daemon;
+            }
+        }
+        for (const std::string &daemon : row.staying)
+            EXPECT_TRUE(test::Runs(daemon)) << daemon;
+    }
+
+    const Row &row = GetParam();
+    const char *const key = TAVOServiceKeyGet(row.id);
+};
+
+class Keyed : public Every {};
+class Keyless : public Every {};
+class WithDaemon : public Every {};
+class WithPidFile : public Every {};
+
+TEST_P(Keyed, EveryAction)
+{
+    ScriptCalls();
+    EXPECT_EQ(Act(TAVO_SERVICE_KEY_NO), 0);
+    EXPECT_EQ(Setting(key), "no");
+    EXPECT_EQ(TAVOServiceStatusGet(row.id), 0);
+    EXPECT_EQ(Act(TAVO_SERVICE_KEY_YES), 0);
+    EXPECT_EQ(Setting(key), "yes");
+    EXPECT_THAT(ScriptCalls(), IsEmpty()) << "the key alone";
+
+    ASSERT_EQ(Act(TAVO_SERVICE_KEY_NO), 0);
+    EXPECT_EQ(Act(TAVO_SERVICE_ENABLE), 0);
+    EXPECT_EQ(Setting(key), "yes");
+    EXPECT_EQ(ScriptCalls(), row.start);
+    ExpectRunning();
+    EXPECT_TRUE(IsOn());
+    ExpectBound(true);
+
+    EXPECT_EQ(Act(TAVO_SERVICE_STOP), 0);
+    EXPECT_EQ(Setting(key), "yes");
+    EXPECT_EQ(ScriptCalls(), row.stop);
+    ExpectStopped();
+    EXPECT_TRUE(Soon([&] { return TAVOServiceStatusGet(row.id) == row.on_when_stopped; }));
+    ExpectBound(true);
+
+    EXPECT_EQ(Act(TAVO_SERVICE_START), 0);
+    EXPECT_EQ(ScriptCalls(), row.start);
+    ExpectRunning();
+    EXPECT_TRUE(IsOn());
+
+    std::map<std::string, pid_t> before;
+    for (const std::string &daemon : row.daemons)
+        before[daemon] = DaemonPid(daemon);
+    EXPECT_EQ(Act(TAVO_SERVICE_RESTART), 0);
+    EXPECT_EQ(ScriptCalls(), row.restart);
+    ExpectRunning();
+    for (const std::string &daemon : row.daemons)
+        EXPECT_NE(DaemonPid(daemon), before[daemon]) << daemon;
+    EXPECT_TRUE(IsOn());
+
+    EXPECT_EQ(Act(TAVO_SERVICE_DISABLE), 0);
+    EXPECT_EQ(Setting(key), "no");
+    EXPECT_EQ(ScriptCalls(), row.stop);
+    ExpectStopped();
+    EXPECT_EQ(TAVOServiceStatusGet(row.id), 0) << "whatever still runs";
+    ExpectBound(false);
+
+    for (const int action : {-1, 7}) {
+        EXPECT_EQ(Act(action), -1);
+        EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+    }
+    EXPECT_EQ(Setting(key), "no");
+    EXPECT_THAT(ScriptCalls(), IsEmpty());
+}
+
+TEST_P(Keyless, EveryAction)
+{
+    const std::string settings = test::ReadFile("/etc/tavoinfo.conf");
+    ScriptCalls();
+    for (const auto &[start, stop] :
+         {std::pair(TAVO_SERVICE_ENABLE, TAVO_SERVICE_DISABLE), std::pair(TAVO_SERVICE_START, TAVO_SERVICE_STOP)}) {
+        if (row.id == kRestore) {
+            for (const int action : {+start, +stop, +TAVO_SERVICE_RESTART}) {
+                EXPECT_EQ(Act(action), -1) << "it has no command";
+                EXPECT_EQ(LastFault(), (Fault{ERR_SERVICE_STD_ACTION, "service_action_set"}));
+            }
+            continue;
+        }
+        EXPECT_TRUE(Soon([&] { return TAVOServiceStatusGet(row.id) == 0; }));
+        EXPECT_EQ(Act(start), 0);
+        EXPECT_EQ(ScriptCalls(), row.start);
+        ExpectRunning();
+        EXPECT_TRUE(IsOn());
+        EXPECT_EQ(Act(TAVO_SERVICE_RESTART), 0);
+        EXPECT_EQ(ScriptCalls(), row.restart);
+        ExpectRunning();
+        EXPECT_TRUE(IsOn());
+        EXPECT_EQ(Act(stop), 0);
+        EXPECT_EQ(ScriptCalls(), row.stop);
+        ExpectStopped();
+    }
+    log_.Clear();
+    for (const int action : {5, 6, 7, -1}) {
+        EXPECT_EQ(Act(action), -1) << action;
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_action_set"})) << action;
+        ASSERT_EQ(log_.Lines().size(), 1u);
+        EXPECT_THAT(log_.Lines()[0].text, MatchesRegex("service_action_set:[0-9]+ Illegal action with Daemon " +
+                                                       std::string(TAVOServiceNameGet(row.id))));
+        log_.Clear();
+    }
+    EXPECT_THAT(ScriptCalls(), IsEmpty());
+    EXPECT_EQ(test::ReadFile("/etc/tavoinfo.conf"), settings);
+}
+
+// The key is written before the daemon is started: such a service is enabled and does not run.
+TEST_P(WithDaemon, DiesAtOnce)
+{
+    WriteFile(std::string("/var/standin/") + row.daemon + ".mode", "dies\n");
+    EXPECT_EQ(Act(key ? TAVO_SERVICE_ENABLE : TAVO_SERVICE_START), row.dies);
+    if (row.dies == failed) {
+        EXPECT_EQ(LastFault().code, ERR_SERVICE_STD_ACTION);
+    }
+    EXPECT_EQ(DaemonPid(row.daemon), 0);
+    EXPECT_EQ(TAVOServiceStatusGet(row.id), key && row.on_when_stopped && row.id != 13);
+    if (key) {
+        EXPECT_EQ(Setting(key), "yes");
+        ExpectBound(true);
+    }
+}
+
+TEST_P(WithDaemon, DoesNotEnd)
+{
+    ASSERT_EQ(Act(key ? TAVO_SERVICE_ENABLE : TAVO_SERVICE_START), 0);
+    ASSERT_TRUE(IsOn());
+    ASSERT_EQ(Act(TAVO_SERVICE_STOP), 0);
+    WriteFile(std::string("/var/standin/") + row.daemon + ".mode", "stubborn\n");
+    ASSERT_EQ(Act(TAVO_SERVICE_START), 0);
+    ASSERT_TRUE(IsOn());
+    const pid_t before = DaemonPid(row.daemon);
+
+    EXPECT_EQ(Act(TAVO_SERVICE_STOP), row.stubborn);
+    if (row.stubborn == failed) {
+        EXPECT_EQ(LastFault().code, ERR_SERVICE_STD_ACTION);
+    }
+    EXPECT_EQ(DaemonPid(row.daemon), before) << "it was asked, and not killed";
+    EXPECT_TRUE(IsOn()) << "so it is still on";
+}
+
+// A pid file that says nothing of the daemon, whatever it says, is none.
+TEST_P(WithPidFile, HasAPidFileThatIsNotItsOwn)
+{
+    for (const char *mode : {"garbage", "stale", "nopid"}) {
+        SCOPED_TRACE(mode);
+        WriteFile(std::string("/var/standin/") + row.daemon + ".mode", mode);
+        EXPECT_EQ(Act(key ? TAVO_SERVICE_ENABLE : TAVO_SERVICE_START), 0);
+        EXPECT_TRUE(test::Runs(row.daemon));
+        EXPECT_EQ(TAVOServiceStatusGet(row.id), 0);
+        std::filesystem::remove(TAVOServiceProcGet(row.id));
+        test::ResetStandins();
+    }
+}
+
+TEST_P(WithPidFile, WritesItLate)
+{
+    WriteFile(std::string("/var/standin/") + row.daemon + ".mode", "late\n");
+    EXPECT_EQ(Act(key ? TAVO_SERVICE_ENABLE : TAVO_SERVICE_START), 0);
+    EXPECT_TRUE(IsUp(row.id));
+}
+
+template <class Wanted>
+std::vector<Row> Those(Wanted wanted)
+{
+    std::vector<Row> those;
+    std::copy_if(std::begin(rows), std::end(rows), std::back_inserter(those), wanted);
+    return those;
+}
+
+std::string Name(const testing::TestParamInfo<Row> &info)
+{
+    return TAVOServiceNameGet(info.param.id);
+}
+
+INSTANTIATE_TEST_SUITE_P(Every, Keyed,
+                         testing::ValuesIn(Those([](const Row &row) { return TAVOServiceKeyGet(row.id) != nullptr; })),
+                         Name);
+INSTANTIATE_TEST_SUITE_P(Every, Keyless,
+                         testing::ValuesIn(Those([](const Row &row) { return TAVOServiceKeyGet(row.id) == nullptr; })),
+                         Name);
+INSTANTIATE_TEST_SUITE_P(Every, WithDaemon, testing::ValuesIn(Those([](const Row &row) { return row.daemon; })), Name);
+INSTANTIATE_TEST_SUITE_P(Every, WithPidFile, testing::ValuesIn(Those([](const Row &row) { return row.has_pid_file; })),
+                         Name);
+
+TEST(EveryService, IsInTheTable)
+{
+    ASSERT_EQ(std::size(rows), 30u);
+    for (int id = 0; id < 30; ++id)
+        EXPECT_EQ(rows[id].id, id);
+}
+
+}  // namespace
