@@ -222,7 +222,6 @@ TEST(NetService, BelievesNoHostilePidFile)
     }
     ::kill(bystander, SIGKILL);
     ::waitpid(bystander, nullptr, 0);
-    test::ResetStandins();
 }
 
 TEST(NetService, RefusesAndLogs)
@@ -248,7 +247,6 @@ TEST(NetService, ScriptThatLocksFailsInTime)
     EXPECT_LE(::time(nullptr) - before, 60);
     std::filesystem::remove("/var/standin/S04crond.sh.hook");
     EXPECT_EQ(TAVONetService(TAVO_DAEMON_CRON, TAVO_DAEMON_START), static_cast<int>(TAVO_DAEMON_CRON));
-    test::ResetStandins();
 }
 
 TEST(NetService, TwoProcessesNeverInterleave)
@@ -280,7 +278,6 @@ TEST(NetService, TwoProcessesNeverInterleave)
         EXPECT_EQ(events[i + 2], "S99mDNS.sh restart");
         EXPECT_EQ(events[i + 3], "S99mDNS.sh restart = 0");
     }
-    test::ResetStandins();
 }
 
 TEST(ServiceActionSet, DrivesKeylessServicesByTheirDaemons)

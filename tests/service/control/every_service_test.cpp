@@ -235,17 +235,6 @@ class Every : public test::Services, public testing::WithParamInterface<Row> {
         }
     }
 
-    void TearDown() override
-    {
-        if (IsSkipped())
-            return;
-        for (const int32_t *share = TAVOServiceShareIDGet(row.id); *share != TAVO_SERVICE_SHARE_END; ++share)
-            TAVOServiceRemove(*share, 1);
-        if (key)
-            TAVOServiceActionSet(row.id, TAVO_SERVICE_KEY_NO);
-        Services::TearDown();
-    }
-
     int Act(int action) const { return TAVOServiceActionSet(row.id, action); }
 
     // The stack of databases is several services and no one's status.

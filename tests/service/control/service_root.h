@@ -124,7 +124,6 @@ class Services : public testing::Test {
 
     void TearDown() override
     {
-        ResetStandins();
         for (const char *volume : {"/volume1", "/volume2"})
             ::umount2(volume, MNT_DETACH);
     }
