@@ -58,6 +58,12 @@ void Arguments::Option(const std::string &name, const std::string &value_name, s
     parts_->Add({name, value_name, help, false, false, false, candidates}, value);
 }
 
+void Arguments::Option(const std::string &name, const std::string &value_name, std::optional<std::string> &value,
+                       const std::string &help, Candidates candidates)
+{
+    parts_->Add({name, value_name, help, false, false, false, candidates}, value);
+}
+
 void Arguments::Number(const std::string &name, const std::string &value_name, int &value, const std::string &help,
                        int least, int most)
 {

@@ -4,6 +4,7 @@
 
 #include <limits>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -41,6 +42,9 @@ class Arguments {
     // An option that takes a value of this name.
     void Option(const std::string &name, const std::string &value_name, std::string &value, const std::string &help,
                 Candidates candidates = nullptr);
+    // Nothing when it is not given, which is not the same as an empty text.
+    void Option(const std::string &name, const std::string &value_name, std::optional<std::string> &value,
+                const std::string &help, Candidates candidates = nullptr);
     void Number(const std::string &name, const std::string &value_name, int &value, const std::string &help,
                 int least = 0, int most = std::numeric_limits<int>::max());
     void Flag(const std::string &name, bool &value, const std::string &help);

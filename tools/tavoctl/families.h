@@ -15,13 +15,17 @@ AddFamily AddDisk;
 AddFamily AddPartition;
 AddFamily AddRaid;
 AddFamily AddLvm;
+AddFamily AddUser;
+AddFamily AddGroup;
+AddFamily AddQuota;
 AddFamily AddService;
 AddFamily AddError;
 AddFamily AddVersion;
 
 // In the order of the help text.
 inline constexpr AddFamily *families[] = {
-    AddConf, AddSection, AddLock, AddProc, AddDisk, AddPartition, AddRaid, AddLvm, AddService, AddError, AddVersion,
+    AddConf, AddSection, AddLock,  AddProc,  AddDisk,    AddPartition, AddRaid,
+    AddLvm,  AddUser,    AddGroup, AddQuota, AddService, AddError,     AddVersion,
 };
 
 }  // namespace tavoctl

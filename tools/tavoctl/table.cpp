@@ -64,6 +64,23 @@ std::string Cell::Text() const
     return "-";
 }
 
+std::string Cell::Csv() const
+{
+    std::string text;
+    if (const auto *bytes = std::get_if<std::string>(&value_))
+        text = *bytes;
+    else if (const auto *texts = std::get_if<std::vector<std::string>>(&value_))
+        text = Joined(*texts);
+    else if (!std::holds_alternative<std::monostate>(value_))
+        text = Text();
+    if (text.find_first_of(",\"\r\n") == std::string::npos)
+        return text;
+    std::string quoted = "\"";
+    for (const char c : text)
+        quoted += c == '"' ? std::string("\"\"") : std::string(1, c);
+    return quoted + "\"";
+}
+
 nlohmann::ordered_json Cell::Json() const
 {
     if (std::holds_alternative<std::monostate>(value_))
@@ -109,6 +126,19 @@ std::string Table::Text() const
         }
     }
     return text;
+}
+
+std::string Table::Csv() const
+{
+    std::string text;
+    for (std::size_t i = 0; i < columns_.size(); ++i)
+        text += (i ? "," : "") + columns_[i];
+    for (const auto &row : rows_) {
+        text += "\n";
+        for (std::size_t i = 0; i < row.size(); ++i)
+            text += (i ? "," : "") + row[i].Csv();
+    }
+    return text + "\n";
 }
 
 nlohmann::ordered_json Table::Json() const

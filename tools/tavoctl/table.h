@@ -32,6 +32,7 @@ class Cell {
 
     bool IsNumber() const { return std::holds_alternative<int64_t>(value_) || std::holds_alternative<Bytes>(value_); }
     std::string Text() const;  // printable
+    std::string Csv() const;   // byte for byte; quoted where that is needed
     nlohmann::ordered_json Json() const;
 
   private:
@@ -47,6 +48,7 @@ class Table {
     bool Empty() const { return rows_.empty(); }
 
     std::string Text() const;             // numbers to the right; nothing at all without rows
+    std::string Csv() const;              // comma-separated values with a line of the columns' names
     nlohmann::ordered_json Json() const;  // an array of objects
 
   private:

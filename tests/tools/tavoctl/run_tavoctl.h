@@ -57,19 +57,25 @@ inline int ShellStatus(int status)
 // A tavoctl that is still running. Its outputs are pipes.
 class RunningTavoctl {
   public:
-    explicit RunningTavoctl(const Words &words)
+    // It reads the input, which must fit into a pipe, as its standard input.
+    explicit RunningTavoctl(const Words &words, const std::string &input = {})
     {
+        int in[2];
         int out[2];
         int err[2];
+        EXPECT_EQ(::pipe2(in, O_CLOEXEC), 0);
+        EXPECT_EQ(::write(in[1], input.data(), input.size()), static_cast<ssize_t>(input.size()));
+        ::close(in[1]);
         EXPECT_EQ(::pipe2(out, O_CLOEXEC), 0);
         EXPECT_EQ(::pipe2(err, O_CLOEXEC), 0);
         pid_ = ::fork();
         if (pid_ == 0) {
-            ::dup2(::open("/dev/null", O_RDONLY), 0);
+            ::dup2(in[0], 0);
             ::dup2(out[1], 1);
             ::dup2(err[1], 2);
             BecomeTavoctl(words);
         }
+        ::close(in[0]);
         ::close(out[1]);
         ::close(err[1]);
         out_ = out[0];
@@ -116,13 +122,18 @@ class RunningTavoctl {
     int err_;
 };
 
-inline Ran Tavoctl(const Words &words)
+inline Ran Tavoctl(const Words &words, const std::string &input = {})
 {
-    return RunningTavoctl(words).Wait();
+    return RunningTavoctl(words, input).Wait();
 }
 
-// At a terminal: the person there types `typed`; everything shown comes back as it was sent.
-inline Ran TavoctlAtTerminal(const Words &words, const std::string &typed = {})
+struct Answer {
+    std::string prompt;  // once this is shown
+    std::string typed;   // the person types that
+};
+
+// At a terminal; everything shown comes back as it was sent.
+inline Ran TavoctlAtTerminal(const Words &words, const std::vector<Answer> &answers)
 {
     const int master = ::posix_openpt(O_RDWR | O_NOCTTY | O_CLOEXEC);
     EXPECT_GE(master, 0);
@@ -138,16 +149,34 @@ inline Ran TavoctlAtTerminal(const Words &words, const std::string &typed = {})
         BecomeTavoctl(words);
     }
     ::close(terminal);
-    EXPECT_EQ(::write(master, typed.data(), typed.size()), static_cast<ssize_t>(typed.size()));
     Ran ran = {};
+    std::size_t seen = 0;
+    auto answer = answers.begin();
     char bytes[4096];
-    for (ssize_t count; (count = ::read(master, bytes, sizeof bytes)) > 0;)
+    do {
+        if (answer != answers.end())
+            if (const std::size_t at = ran.out.find(answer->prompt, seen); at != std::string::npos) {
+                seen = at + answer->prompt.size();
+                EXPECT_EQ(::write(master, answer->typed.data(), answer->typed.size()),
+                          static_cast<ssize_t>(answer->typed.size()));
+                ++answer;
+            }
+        const ssize_t count = ::read(master, bytes, sizeof bytes);
+        if (count <= 0)
+            break;
         ran.out.append(bytes, static_cast<std::size_t>(count));
+    } while (true);
     ::close(master);
     int status = 0;
     ::waitpid(pid, &status, 0);
     ran.status = ShellStatus(status);
     return ran;
+}
+
+// What is typed is there before the program asks.
+inline Ran TavoctlAtTerminal(const Words &words, const std::string &typed = {})
+{
+    return TavoctlAtTerminal(words, {{"", typed}});
 }
 
 }  // namespace test

@@ -1,0 +1,445 @@
+// tavoctl user, group and quota: what becomes of the files, and what is refused before anything does.
+#include "run_tavoctl.h"
+
+#include "support/scratch_dir.h"
+
+#include <gmock/gmock.h>
+#include <nlohmann/json.hpp>
+
+#include <filesystem>
+#include <sstream>
+
+#include <crypt.h>
+#include <sys/inotify.h>
+#include <sys/stat.h>
+
+namespace {
+
+using nlohmann::json;
+using test::ReadFile;
+using test::ScratchDir;
+using test::Tavoctl;
+using test::TavoctlAtTerminal;
+using test::Words;
+using test::WriteFile;
+using testing::AllOf;
+using testing::Contains;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::Not;
+
+constexpr char passwd[] = "/etc/passwd";
+constexpr char shadow[] = "/etc/shadow";
+constexpr char misc[] = "/etc/tavouser.conf";
+constexpr char samba[] = "/usr/tavo/etc/private/smbpasswd";
+constexpr char groups[] = "/etc/group";
+
+// The fields of an account's line; none when there is no line.
+std::vector<std::string> Fields(const char *path, const std::string &name)
+{
+    std::istringstream lines(std::filesystem::exists(path) ? ReadFile(path) : "");
+    std::vector<std::string> fields;
+    for (std::string line; std::getline(lines, line);) {
+        if (!line.starts_with(name + ":"))
+            continue;
+        std::istringstream rest(line + ":");
+        for (std::string field; std::getline(rest, field, ':');)
+            fields.push_back(field);
+    }
+    return fields;
+}
+
+std::string Line(const char *path, const std::string &name)
+{
+    std::string line;
+    for (const std::string &field : Fields(path, name))
+        line += field + ":";
+    return line.substr(0, line.empty() ? 0 : line.size() - 1);
+}
+
+std::vector<std::string> AccountFiles()
+{
+    std::vector<std::string> texts;
+    for (const char *path : {passwd, shadow, misc, samba, groups, "/etc/group_desc"})
+        texts.push_back(std::filesystem::exists(path) ? ReadFile(path) : "");
+    return texts;
+}
+
+bool PasswordIs(const std::string &user, const std::string &password)
+{
+    const std::vector<std::string> fields = Fields(shadow, user);
+    crypt_data data = {};
+    return fields.size() > 1 && fields[1] == ::crypt_r(password.c_str(), fields[1].c_str(), &data);
+}
+
+void ExpectDone(const Words &words, const std::string &input = {})
+{
+    const test::Ran ran = Tavoctl(words, input);
+    EXPECT_EQ(ran.status, 0) << testing::PrintToString(words) << ran;
+    EXPECT_EQ(ran.out + ran.err, "") << testing::PrintToString(words);
+}
+
+json Shown(Words words)
+{
+    words.emplace_back("--json");
+    const test::Ran ran = Tavoctl(words);
+    EXPECT_TRUE(json::accept(ran.out)) << testing::PrintToString(words) << ran;
+    return json::accept(ran.out) ? json::parse(ran.out) : json();
+}
+
+class TavoctlAccounts : public testing::Test {
+  protected:
+    void SetUp() override
+    {
+        if (test::RootLacks("foreign-exec"))
+            GTEST_SKIP() << "no program can be started here";
+        ExpectDone({"user", "add", "anna", "--description", "Anna: of Berg", "--mail", "anna@example.com", "--shell",
+                    "/bin/sh", "--privilege", "0x23", "--expires", "2037-01-31"},
+                   "secret one\nmore");
+        ExpectDone({"user", "add", "berta", "--uid", "2000", "--gid", "101", "--cannot-change-password", "yes",
+                    "--empty-password"});
+    }
+};
+
+TEST_F(TavoctlAccounts, UsersAreAddedChangedAndRenamed)
+{
+    const std::string uid = Fields(passwd, "anna").at(2);
+    EXPECT_EQ(Line(passwd, "anna"), "anna:x:" + uid + ":100:Anna%3A of Berg:/var/services/homes/anna:/bin/sh");
+    EXPECT_EQ(Line(passwd, "berta"), "berta:x:2000:101::/var/services/homes/berta:/bin/csh");
+    EXPECT_EQ(Line(misc, "anna"), "anna:35:anna@example.com");
+    EXPECT_EQ(Fields(shadow, "anna").at(7), "24502");
+    EXPECT_EQ(Fields(shadow, "berta").at(3), "100000");
+    EXPECT_TRUE(PasswordIs("anna", "secret one"));
+    EXPECT_TRUE(PasswordIs("berta", ""));
+
+    // What is not given stays, the password with its hashes too.
+    const std::string hash = Fields(shadow, "anna").at(1);
+    const std::vector<std::string> samba_before = Fields(samba, "anna");
+    ExpectDone({"user", "modify", "ANNA", "--description", "", "--cannot-change-password", "yes"});
+    EXPECT_EQ(Line(passwd, "anna"), "anna:x:" + uid + ":100::/var/services/homes/anna:/bin/sh");
+    EXPECT_EQ(Line(misc, "anna"), "anna:35:anna@example.com");
+    EXPECT_EQ(Fields(shadow, "anna").at(1), hash);
+    EXPECT_EQ(Fields(shadow, "anna").at(3), "100000");
+    ExpectDone({"user", "expire", "anna", "never"});
+    EXPECT_EQ(Fields(shadow, "anna").at(7), "");
+    EXPECT_EQ(Fields(samba, "anna").at(2), samba_before.at(2));
+    EXPECT_EQ(Fields(samba, "anna").at(3), samba_before.at(3));
+
+    ExpectDone({"group", "add", "staff", "--members", "Berta,anna", "--description", "All of us"});
+    ExpectDone({"user", "rename", "anna", "Anna"});
+    ExpectDone({"user", "rename", "berta", "bert"});
+    EXPECT_EQ(Line(passwd, "Anna"), "Anna:x:" + uid + ":100::/var/services/homes/Anna:/bin/sh");
+    EXPECT_EQ(Line(passwd, "anna") + Line(passwd, "berta"), "");
+    EXPECT_EQ(Fields(groups, "staff").at(3), "bert,Anna");
+    EXPECT_TRUE(PasswordIs("Anna", "secret one"));
+
+    EXPECT_EQ(Tavoctl({"user", "delete", "anna", "bert"}).status, 2);  // nobody can be asked
+    ExpectDone({"user", "delete", "--yes", "anna", "bert"});
+    EXPECT_EQ(Line(passwd, "Anna") + Line(shadow, "Anna") + Line(misc, "bert") + Line(samba, "bert"), "");
+    EXPECT_EQ(Line(groups, "staff"), "staff:x:" + Fields(groups, "staff").at(2) + ":");
+}
+
+TEST_F(TavoctlAccounts, GroupsAreAddedChangedAndRenamed)
+{
+    ExpectDone({"group", "add", "staff"});
+    const std::string gid = Fields(groups, "staff").at(2);
+    ExpectDone({"group", "modify", "staff", "--join", "ANNA,berta,anna"});
+    EXPECT_EQ(Line(groups, "staff"), "staff:x:" + gid + ":anna,berta");
+    ExpectDone({"group", "modify", "STAFF", "--leave", "Anna", "--description", "Us"});
+    EXPECT_EQ(Line(groups, "staff"), "staff:x:" + gid + ":berta");
+    ExpectDone({"group", "modify", "staff", "--members", "", "--gid", "70000"});
+    ExpectDone({"group", "rename", "staff", "Team"});
+    EXPECT_EQ(Line(groups, "Team") + Line(groups, "staff"), "Team:x:70000:");
+    EXPECT_EQ(Line("/etc/group_desc", "Team"), "Team:Us");
+    EXPECT_EQ(Shown({"group", "show", "team"}), json::parse(R"({"name": "Team", "kind": "local", "gid": 70000,
+        "description": "Us", "members": [], "strangers": []})"));
+    EXPECT_THAT(Shown({"group", "show", "users"}).at("members"), AllOf(Contains("anna"), Contains("admin")));
+    ExpectDone({"group", "delete", "--yes", "team"});
+    EXPECT_EQ(Line(groups, "Team"), "");
+}
+
+TEST_F(TavoctlAccounts, ReadingVerbsSayTheSameAsTheFiles)
+{
+    const int uid = std::stoi(Fields(passwd, "anna").at(2));
+    json anna = {{"name", "anna"},
+                 {"kind", "local"},
+                 {"uid", uid},
+                 {"gid", 100},
+                 {"description", "Anna: of Berg"},
+                 {"home", "/var/services/homes/anna"},
+                 {"shell", "/bin/sh"},
+                 {"mail", "anna@example.com"},
+                 {"privilege", "0x23"},
+                 {"password", "set"},
+                 {"cannot_change_password", false},
+                 {"expires", "2037/01/31"},
+                 {"expired", false},
+                 {"groups", {"users"}}};
+    EXPECT_EQ(Shown({"user", "show", "Anna"}), anna);
+    EXPECT_EQ(Shown({"user", "show", "--uid", std::to_string(uid)}), anna);
+    EXPECT_EQ(Shown({"user", "show", "admin"}).at("password"), "locked");
+
+    const auto names = [](const json &list) {
+        std::vector<std::string> found;
+        for (const json &row : list)
+            found.push_back(row.at("name"));
+        return found;
+    };
+    EXPECT_THAT(names(Shown({"user", "list"})), ElementsAre("admin", "anna", "berta", "guest"));
+    EXPECT_THAT(names(Shown({"user", "list", "--prefix", "A"})), ElementsAre("admin", "anna"));
+    EXPECT_THAT(names(Shown({"user", "list", "--part", "ERT"})), ElementsAre("berta"));
+    const json guest = Shown({"user", "list", "--prefix", "guest"}).at(0);
+    EXPECT_EQ(guest.at("expires"), "1970/01/02");
+    EXPECT_EQ(guest.at("expired"), true);
+    EXPECT_EQ(Tavoctl({"--complete", "user", "show", "an"}).out, "anna\n");
+}
+
+struct Refusal {
+    Words words;
+    int status;
+    const char *reason;
+};
+
+TEST_F(TavoctlAccounts, WhatIsRefusedChangesNothing)
+{
+    const Refusal refusals[] = {
+        {{"user", "add", "--empty-password", "Anna"}, 1, "ERR_USER_EXISTS"},
+        {{"user", "add", "--empty-password", "a:b"}, 1, "ERR_INVALID_USERNAME"},
+        {{"user", "add", "--empty-password", "..", "--uid", "3000"}, 1, "ERR_INVALID_USERNAME"},
+        {{"user", "add", "--empty-password", "eve", "--home", "/var/../etc"}, 2, "ERR_BAD_PARAMETERS"},
+        {{"user", "add", "--empty-password", "eve", "--shell", "/bin/sh:"}, 2, "ERR_BAD_PARAMETERS"},
+        {{"user", "add", "--empty-password", "eve", "--uid", "2000"}, 2, "berta"},
+        {{"user", "modify", "anna", "--uid", "0"}, 2, "root"},
+        {{"user", "rename", "anna", "BERTA"}, 1, "ERR_USER_EXISTS"},
+        {{"user", "rename", "anna", "an/na"}, 1, "ERR_INVALID_USERNAME"},
+        {{"user", "passwd", "nemo"}, 3, "ERR_NO_SUCH_USER"},
+        {{"user", "show", "nemo"}, 3, "ERR_NO_SUCH_USER"},
+        {{"user", "delete", "--yes", "anna", "nemo"}, 3, "ERR_NO_SUCH_USER"},
+        {{"user", "delete", "--yes", "anna", "Admin", "--system"}, 1, "ERR_USER_DB_DELETE"},
+        {{"user", "delete", "--yes", "anna", "guest"}, 2, "--system"},
+        {{"group", "add", "sixteen letters!"}, 1, "ERR_INVALID_GROUPNAME"},
+        {{"group", "add", "Users"}, 1, "ERR_GROUP_EXISTS"},
+        {{"group", "add", "staff", "--members", "anna,nemo"}, 3, "nemo"},
+        {{"group", "add", "staff", "--description", "a:b"}, 2, "ERR_BAD_PARAMETERS"},
+        {{"group", "add", "staff", "--gid", "100"}, 2, "users"},
+        {{"group", "modify", "administrators", "--leave", "anna"}, 3, "no member"},
+        {{"group", "rename", "nemo", "nobodies"}, 3, "ERR_NO_SUCH_GROUP"},
+        {{"quota", "set", "anna", "7", "1M"}, 3, "not mounted"},
+        {{"quota", "get", "anna", "7"}, 3, "not mounted"},
+    };
+    for (const Refusal &refusal : refusals) {
+        const std::vector<std::string> before = AccountFiles();
+        const test::Ran ran = Tavoctl(refusal.words);
+        EXPECT_EQ(ran.status, refusal.status) << testing::PrintToString(refusal.words) << ran;
+        EXPECT_THAT(ran.err, HasSubstr(refusal.reason)) << testing::PrintToString(refusal.words);
+        EXPECT_EQ(ran.out, "");
+        EXPECT_EQ(AccountFiles(), before) << testing::PrintToString(refusal.words);
+    }
+}
+
+TEST_F(TavoctlAccounts, NamesThatMislead)
+{
+    EXPECT_THAT(Tavoctl({"user", "add", "--unknown-password", "0815"}).err, HasSubstr("warning"));
+    EXPECT_THAT(Tavoctl({"user", "add", "--unknown-password", "a b"}).err, HasSubstr("warning"));
+    EXPECT_THAT(Tavoctl({"user", "rename", "a b", "\xD0\xB0nna"}).err, HasSubstr("warning"));
+    // All ids were handed out once: the next is one that somebody had.
+    WriteFile(misc, "#$_@UID__INDEX@_$3072$\n" + ReadFile(misc).substr(ReadFile(misc).find('\n') + 1));
+    const test::Ran ran = Tavoctl({"user", "add", "--unknown-password", "carla"});
+    EXPECT_EQ(ran.status, 0) << ran;
+    EXPECT_THAT(ran.err, HasSubstr("the user id " + Fields(passwd, "carla").at(2) + " was somebody's before"));
+    EXPECT_FALSE(PasswordIs("carla", ""));
+}
+
+TEST_F(TavoctlAccounts, PasswordsAreTypedTwiceAndNeverShown)
+{
+    if (test::RootLacks("pts"))
+        GTEST_SKIP() << "no terminals here";
+    const auto type = [](const char *first, const char *second) {
+        return TavoctlAtTerminal({"user", "passwd", "anna"}, {{"Password of anna: ", first}, {"Again: ", second}});
+    };
+    const test::Ran good = type("n3w w0rd\n", "n3w w0rd\n");
+    EXPECT_EQ(good.status, 0) << good;
+    EXPECT_EQ(good.out, "Password of anna: \r\nAgain: \r\n");
+    EXPECT_TRUE(PasswordIs("anna", "n3w w0rd"));
+    EXPECT_EQ(type("one\n", "two\n").status, 1);
+    EXPECT_EQ(type("\n", "").status, 2);
+    EXPECT_TRUE(PasswordIs("anna", "n3w w0rd"));
+
+    ExpectDone({"user", "passwd", "anna"}, "piped\n");
+    EXPECT_TRUE(PasswordIs("anna", "piped"));
+    EXPECT_EQ(Tavoctl({"user", "passwd", "anna"}, "").status, 2);
+    EXPECT_EQ(Tavoctl({"user", "passwd", "anna"}, std::string("a\0b\n", 4)).status, 2);
+    EXPECT_EQ(Tavoctl({"user", "passwd", "anna"}, Fields(shadow, "anna").at(1)).status, 2);
+    EXPECT_TRUE(PasswordIs("anna", "piped"));
+    ExpectDone({"user", "passwd", "anna", "--empty-password"});
+    EXPECT_TRUE(PasswordIs("anna", ""));
+}
+
+TEST_F(TavoctlAccounts, ExportedAccountsComeBackAsTheyWere)
+{
+    const ScratchDir dir;
+    ExpectDone({"user", "modify", "anna", "--description", "A, \"B\": ' C"});
+    for (const bool as_json : {false, true}) {
+        Words words = {"user", "export", "--hashes", "--output", dir / (as_json ? "u.json" : "u.csv")};
+        Words group_words = {"group", "export", "--output", dir / (as_json ? "g.json" : "g.csv")};
+        if (as_json) {
+            words.emplace_back("--json");
+            group_words.emplace_back("--json");
+        }
+        ExpectDone({"group", "add", "staff", "--members", "berta,anna", "--description", "x, y"});
+        ExpectDone(words);
+        ExpectDone(group_words);
+        struct stat state = {};
+        EXPECT_EQ(::stat(words[4].c_str(), &state), 0);
+        EXPECT_EQ(state.st_mode & 07777u, 0600u);
+        EXPECT_EQ(Tavoctl(words).status, 1) << "a file that is there stays";
+
+        std::vector<std::string> before;
+        for (const char *name : {"anna", "berta"})
+            for (const char *path : {passwd, shadow, misc, samba})
+                before.push_back(Line(path, name).substr(0, Line(path, name).find(":LCT-")));
+        ExpectDone({"user", "delete", "--yes", "anna", "berta"});
+        ExpectDone({"group", "delete", "--yes", "staff"});
+        EXPECT_EQ(Tavoctl({"user", "import", words[4]}).status, 1) << "admin is there";
+        EXPECT_EQ(Line(passwd, "anna"), "");
+        ExpectDone({"user", "import", "--update", words[4]});
+        ExpectDone({"group", "import", group_words[3]});
+        std::vector<std::string> after;
+        for (const char *name : {"anna", "berta"})
+            for (const char *path : {passwd, shadow, misc, samba})
+                after.push_back(Line(path, name).substr(0, Line(path, name).find(":LCT-")));
+        EXPECT_EQ(after, before);
+        EXPECT_EQ(Fields(groups, "staff").at(3), "berta,anna");
+        EXPECT_EQ(Line("/etc/group_desc", "staff"), "staff:x, y");
+        EXPECT_EQ(Fields(shadow, "admin").at(1), "*") << "what has no password does not get one";
+        ExpectDone({"group", "delete", "--yes", "staff"});
+    }
+    // Without being asked for them nobody gets the hashes.
+    EXPECT_THAT(Tavoctl({"user", "export"}).out, AllOf(HasSubstr("anna"), Not(HasSubstr("$1$"))));
+    EXPECT_THAT(Tavoctl({"user", "export", "--json"}).out, AllOf(HasSubstr("anna"), Not(HasSubstr("hash"))));
+}
+
+TEST_F(TavoctlAccounts, ImportIsOneBatch)
+{
+    std::string list = "name,password\r\n";
+    for (int i = 0; i < 50; ++i)
+        list += "user" + std::to_string(i) + ",pw" + std::to_string(i) + "\r\n";
+    const int watch = ::inotify_init1(IN_NONBLOCK | IN_CLOEXEC);
+    ASSERT_GE(::inotify_add_watch(watch, "/etc", IN_MOVED_TO), 0);
+    ExpectDone({"user", "import", "-"}, list);
+    alignas(inotify_event) char bytes[8192];
+    const ssize_t size = ::read(watch, bytes, sizeof bytes);
+    int renames = 0;
+    for (ssize_t at = 0; at < size;) {
+        const auto *event = reinterpret_cast<const inotify_event *>(bytes + at);
+        renames += std::string(event->name) == "passwd";
+        at += static_cast<ssize_t>(sizeof *event + event->len);
+    }
+    ::close(watch);
+    EXPECT_EQ(renames, 1);
+    EXPECT_TRUE(PasswordIs("user0", "pw0"));
+    EXPECT_TRUE(PasswordIs("user49", "pw49"));
+}
+
+TEST_F(TavoctlAccounts, AListThatIsWrongAnywhereIsRefusedWhole)
+{
+    const struct {
+        Words verb;
+        std::string list;
+        const char *reason;
+    } cases[] = {
+        {{"user"}, "name,password\nx,1\nanna,1\n", "row 3, anna: ERR_USER_EXISTS"},
+        {{"user"}, "name,password\nx,1\nX,1\n", "twice"},
+        {{"user"}, "name,password\nx,1\n", nullptr},
+        {{"user"}, "name,password\nx,1\ny,\n", "row 3, y: it has no password"},
+        {{"user"}, "name,password\nx,1\ny\n", "row 3 has 1 fields"},
+        {{"user"}, "name,colour\nx,red\n", "colour"},
+        {{"user"}, "name,name\nx,y\n", "twice"},
+        {{"user"}, "password\n1\n", "no name"},
+        {{"user"}, "name,password\nx,\"1\n", "not closed"},
+        {{"user"}, "name,password\nx,1\na:b,1\n", "ERR_INVALID_USERNAME"},
+        {{"user"}, "name,password,uid\nx,1,1024\n", "admin"},
+        {{"user"}, "name,password,uid\nx,1,1500\ny,1,1500\n", "1500"},
+        {{"user"}, "name,password,expires\nx,1,2026/13/01\n", "2026/13/01"},
+        {{"user"}, "name,password_hash\nx,$1$ab$c\n", "some are missing"},
+        {{"user"}, "[{\"name\":\"x\",\"password\":\"1\"},3]", "row 2 is no object"},
+        {{"user"}, "[{\"name\":\"x\",\"password\":{}}]", "fits no field"},
+        {{"user"}, "{\"name\":\"x\"}", "no JSON array"},
+        {{"user"}, "[{\"name\":\"x\",\"password\":\"1\"}", "no JSON array"},
+        {{"group"}, "name,members\nnew,anna\nodd,\"anna,nemo\"\n", "nemo"},
+        {{"group"}, "name,gid\nnew,70000\nodd,70000\n", "twice"},
+    };
+    for (const auto &[verb, list, reason] : cases) {
+        const std::vector<std::string> before = AccountFiles();
+        Words words = verb;
+        words.insert(words.end(), {"import", "-"});
+        if (!reason)
+            words.emplace_back("--dry-run");
+        const test::Ran ran = Tavoctl(words, list);
+        EXPECT_EQ(ran.status != 0, reason != nullptr) << list << ran;
+        EXPECT_THAT(ran.err, HasSubstr(reason ? reason : "")) << list;
+        EXPECT_EQ(AccountFiles(), before) << list;
+    }
+    EXPECT_EQ(Tavoctl({"user", "import", "/none"}).status, 3);
+}
+
+TEST_F(TavoctlAccounts, CheckNamesEveryDifferenceAndRepairsNone)
+{
+    ExpectDone({"group", "add", "staff", "--members", "anna"});
+    EXPECT_EQ(Shown({"user", "check"}), json::array());
+    EXPECT_EQ(Tavoctl({"user", "check"}).status, 0);
+    EXPECT_EQ(Tavoctl({"group", "check"}).status, 0);
+
+    const struct {
+        const char *family;
+        const char *command;
+        const char *name;
+        const char *file;
+        const char *finding;
+    } cases[] = {
+        {"user", "sed -i 's,^\\(anna:.*\\):/bin/sh,\\1:/bin/bash,' /etc/passwd", "anna", passwd,
+         "file and store differ in shell"},
+        {"user", "sed -i 's,^berta:[^:]*:,berta:x:,' /etc/shadow", "berta", shadow,
+         "file and store differ in password"},
+        {"user", "sed -i /^berta:/d /etc/passwd", "berta", passwd, "it is in the store only"},
+        {"user", "sed -i /^berta:/d /etc/passwd", "berta", shadow, "it is not in /etc/passwd"},
+        {"user", "sed -i /^berta:/d /etc/shadow", "berta", shadow, "it is missing: no login"},
+        {"user", "echo 'eve:x:0:0:::/bin/sh' >>/etc/passwd", "eve", passwd, "it is in the file only"},
+        {"user", "echo 'eve:x:0:0:::/bin/sh' >>/etc/passwd", nullptr, passwd, "the id 0 is shared: eve, root"},
+        {"user", "echo 'Anna:x:9:0:::/bin/sh' >>/etc/passwd", "Anna", passwd, "the name is there twice"},
+        {"user", "echo eve:0 >>/etc/tavouser.conf", "eve", misc, "has 2 fields and not 3, or no name"},
+        {"user", "rm /usr/tavo/etc/private/smbpasswd", nullptr, samba, "the file is missing"},
+        {"user", "rm /tmp/.db.user.shadow.1379", nullptr, shadow, "the store is missing"},
+        {"user", "echo garbage >/tmp/.db.user.misc.1379", nullptr, misc, "the store is damaged"},
+        {"user", "rm /tmp/.db.user.uid.1379; mkfifo /tmp/.db.user.uid.1379", nullptr, "/tmp/.db.user.uid.1379",
+         "the store is damaged"},
+        {"group", "sed -i 's,^staff:.*,&;x,' /etc/group", "staff", groups, "the member anna;x is no user"},
+        {"group", "sed -i 's,^staff:.*,&;x,' /etc/group", "staff", groups, "file and store differ in members"},
+        {"group", "echo nobody:here >>/etc/group_desc", "nobody", "/etc/group_desc", "it is in the file only"},
+    };
+    for (const auto &[family, command, name, file, finding] : cases) {
+        ASSERT_EQ(Tavoctl({family, "list"}).status, 0);
+        ASSERT_EQ(Tavoctl({family, "check"}).status, 0) << command;
+        ASSERT_EQ(std::system("rm -rf /root/kept; cp -a /etc /root/kept; cp -a /usr/tavo/etc/private /root/kept"), 0);
+        ASSERT_EQ(std::system(command), 0) << command;
+        const std::vector<std::string> before = AccountFiles();
+        const test::Ran ran = Tavoctl({family, "check", "--json"});
+        EXPECT_EQ(ran.status, 1) << command << ran;
+        bool found = false;
+        for (const json &row : json::parse(ran.out))
+            found |= row.at("name") == (name ? json(name) : json()) && row.at("file") == file &&
+                     row.at("finding").get<std::string>().ends_with(finding);
+        EXPECT_TRUE(found) << command << ran;
+        EXPECT_EQ(AccountFiles(), before) << command;
+        EXPECT_EQ(Tavoctl({family, "check", "--json"}).out, ran.out) << command;  // nor the stores
+        ASSERT_EQ(std::system("cp -a /root/kept/passwd /root/kept/shadow /root/kept/tavouser.conf /root/kept/group "
+                              "/root/kept/group_desc /etc; cp -a /root/kept/private /usr/tavo/etc; rm -rf "
+                              "/tmp/.db.*"),
+                  0);
+    }
+    // After a start of the machine there are no stores, and nothing is wrong.
+    EXPECT_EQ(Tavoctl({"user", "check"}).status, 0);
+    EXPECT_FALSE(std::filesystem::exists("/tmp/.db.user.name.1379"));
+}
+
+}  // namespace

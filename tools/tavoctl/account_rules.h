@@ -1,0 +1,31 @@
+// What tavoctl asks of accounts beyond the library, and what it warns of.
+#ifndef TAVOCTL_ACCOUNT_RULES_H
+#define TAVOCTL_ACCOUNT_RULES_H
+
+#include <string>
+
+namespace tavoctl {
+
+// A line on standard error.
+void Warn(const std::string &text);
+
+// Digits only, blanks, and characters that may look like others.
+void WarnOfName(const std::string &name);
+
+// The user id handed out last, as /etc/tavouser.conf records it; -1 when it does not.
+int LastUserId();
+
+// Ids of deleted users come back once all are used up; their files are still theirs.
+void WarnOfReusedId(const std::string &name, int uid, int last_before);
+
+// Throws a Failure when another account has the id: each would own the files of the other.
+void RefuseTakenId(const std::string &name, int uid);
+
+// Throws a Failure when the model allows fewer than so many further accounts.
+void RefuseTooMany(int additions, const std::string &attempted);
+
+bool ParseYesNo(const std::string &what, const std::string &text);
+
+}  // namespace tavoctl
+
+#endif
