@@ -348,7 +348,7 @@ class Machine:
     # Events from outside
 
     def _answer(self, request):
-        identity, verb, *words = (request.split() + ['', ''])[:4]
+        identity, verb, *words = (request.split() + ['', ''])[:5]
         words = [word for word in words if word]
         try:
             self._happen(verb, *words)
@@ -356,7 +356,7 @@ class Machine:
         except Exception as problem:
             return f'{identity} failed {problem}'.replace('\n', ' ')
 
-    def _happen(self, verb, what, how=''):
+    def _happen(self, verb, what, how='', size=''):
         if verb in ('cut', 'restore') and what in ('eth0', 'eth1'):
             self.monitor('set_link', name=what, up=verb == 'restore')
         elif verb in ('pull', 'plug', 'blank') and what.isdigit() and 1 <= int(what) <= self.hardware.disks:
@@ -367,7 +367,9 @@ class Machine:
             if verb == 'blank' or how == 'blank':
                 disk = self.disks[bay - 1]
                 disk.truncate(0)
-                disk.truncate(self.hardware.size << 20)
+                size = int(size or self.hardware.size) << 20
+                disk.truncate(size)
+                self.monitor('block_resize', **{'node-name': f'disk{bay}', 'size': size})
             if verb == 'plug' and hot:
                 self.monitor('device_add', **self._bay(bay))
         else:

@@ -1,0 +1,301 @@
+// Real arrays: made, broken, mended, changed.
+#include "real_storage.h"
+
+#include <gmock/gmock.h>
+
+// The library looks every half a minute; disks of this size are rebuilt sooner.
+extern "C" unsigned int sleep(unsigned int)
+{
+    ::usleep(200'000);
+    return 0;
+}
+
+namespace {
+
+using test::Array;
+using test::BecomesNormal;
+using test::Disk;
+using test::Make;
+using test::MembersOf;
+using test::ReadArray;
+using test::Shell;
+using test::StatusOf;
+using test::Told;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+
+using MachineArrays = test::StorageTest;
+
+std::vector<std::string> Partitions(int number, int first = 1, int last = 6)
+{
+    std::vector<std::string> paths;
+    for (int bay = first; bay <= last; ++bay)
+        paths.push_back(Disk(bay) + std::to_string(number));
+    return paths;
+}
+
+std::string UuidOf(const std::string &path)
+{
+    char uuid[64] = "";
+    EXPECT_EQ(RAIDUUIDGet(path.c_str(), uuid, sizeof uuid), 1) << path;
+    return uuid;
+}
+
+bool HasSuperblock(const std::string &member)
+{
+    RAIDSUPERBLOCK superblock;
+    return RAIDSBGet(member.c_str(), &superblock) == 1 && superblock.szUuid[0] != 0;
+}
+
+// A disk that is gone is noticed when somebody writes.
+void Touch(const std::string &array)
+{
+    Shell("dd if=/dev/urandom of=" + array + " bs=64k count=64 oflag=direct");
+}
+
+// From blank disks to arrays, through the loss of two disks, and back to nothing.
+TEST_F(MachineArrays, ALifeOfSixDisks)
+{
+    test::PlugLargeDisks(6, 4736);
+    for (int bay = 1; bay <= 6; ++bay) {
+        ASSERT_EQ(PartitionCreate(Disk(bay).c_str(), PARTITION_SYSTEM, nullptr), 0);
+        ASSERT_EQ(PartitionCreate(Disk(bay).c_str(), PARTITION_DATA, nullptr), 0);
+        int version = 0;
+        EXPECT_EQ(BlTAVOCheckPartitionLayout(Disk(bay).c_str(), 1, &version), 1);
+        EXPECT_EQ(version, 7);
+    }
+    // The system and its swap: the rebuild of a small part shows as much as that of the whole.
+    ASSERT_EQ(Make({.path = "/dev/md0", .level = RAID_LEVEL_1, .members = Partitions(1), .mib = 32, .sync = false}), 0);
+    ASSERT_EQ(Make({.path = "/dev/md1", .level = RAID_LEVEL_1, .members = Partitions(2), .mib = 32, .sync = false}), 0);
+    EXPECT_EQ(StatusOf("/dev/md0"), RAID_STATUS_NORMAL);
+    EXPECT_EQ(MembersOf("/dev/md1", RAID_MEMBER_ACTIVE), Partitions(2));
+
+    // Data: four slots, one of them missing.
+    ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_5, .members = Partitions(3, 1, 3), .slots = 4, .mib = 64}),
+              0);
+    EXPECT_EQ(StatusOf("/dev/md2"), RAID_STATUS_DEGRADED);
+    EXPECT_EQ(ReadArray("/dev/md2")->nSlot, 4);
+    EXPECT_EQ(ReadArray("/dev/md2")->cbMember, 64u << 20);
+    EXPECT_EQ(Told("cat /sys/block/md2/md/stripe_cache_size"), "1024\n");
+    EXPECT_EQ(RAIDMdStripeSizeGet("/dev/md2"), 3 * 512);
+    int array = -1;
+    EXPECT_EQ(RAIDDiskIsUsedByRAID("/dev/sda", &array), 1);
+    EXPECT_EQ(array, 2);
+    EXPECT_EQ(RAIDDiskIsUsedByRAID("/dev/sdf", &array), 0);
+
+    // A fourth disk makes it whole.
+    Told("mkfs.ext4 -q /dev/md2 && mount /dev/md2 /mnt && cp -r /bin/busybox /mnt/program && sync");
+    const std::string sum = Told("md5sum /mnt/program");
+    EXPECT_EQ(RAIDAddRobustCheck(ReadArray("/dev/md2").get(), "/dev/sdd3"), 0);
+    EXPECT_TRUE(test::Comes([] {
+        const Array read = ReadArray("/dev/md2");
+        return read->fRebuilding || read->nStatus == RAID_STATUS_NORMAL;
+    }));
+    EXPECT_TRUE(BecomesNormal("/dev/md2"));
+    EXPECT_EQ(RAIDRebuildingWait("/dev/md2"), 0);
+    EXPECT_THAT(MembersOf("/dev/md2", RAID_MEMBER_ACTIVE),
+                ElementsAre("/dev/sda3", "/dev/sdb3", "/dev/sdc3", "/dev/sdd3"));
+
+    // One disk gone: degraded, and the data is there. Two: crashed.
+    test::Happen("pull 2");
+    Touch("/mnt/more");
+    EXPECT_TRUE(test::Comes([] { return StatusOf("/dev/md2") == RAID_STATUS_DEGRADED; }));
+    EXPECT_EQ(MembersOf("/dev/md2", RAID_MEMBER_ACTIVE).size(), 3u);
+    Told("echo 3 >/proc/sys/vm/drop_caches");
+    EXPECT_EQ(Told("md5sum /mnt/program"), sum);
+    EXPECT_EQ(RAIDRebuildingWait("/dev/md2"), -1);
+    test::Happen("pull 3");
+    Touch("/mnt/more");
+    EXPECT_TRUE(test::Comes([] { return StatusOf("/dev/md2") == RAID_STATUS_CRASHED; }));
+    Touch("/dev/md0");
+    EXPECT_TRUE(test::Comes([] { return StatusOf("/dev/md0") == RAID_STATUS_DEGRADED; }));
+
+    // They come back. The crashed array is stopped first, and the others let go of the names.
+    const std::string uuid = UuidOf("/dev/md2");
+    Told("umount -l /mnt");
+    EXPECT_TRUE(test::Comes([] { return RAIDStop("/dev/md2") == 0; }));
+    Touch("/dev/md1");
+    for (const char *path : {"/dev/md0", "/dev/md1"})
+        Told(std::string("mdadm -q ") + path + " --fail detached --remove detached");
+    test::Happen("plug 2");
+    test::Happen("plug 3");
+    EXPECT_EQ(Told("ls /dev/sdb3 /dev/sdc3"), "/dev/sdb3\n/dev/sdc3\n");
+    for (const char *member : {"/dev/sdb1", "/dev/sdc1"})
+        EXPECT_EQ(RAIDAdd(ReadArray("/dev/md0").get(), member), 0);
+    EXPECT_TRUE(BecomesNormal("/dev/md0"));
+
+    // Cleaned by its UUID, this array is gone from its members; nobody else is touched.
+    EXPECT_EQ(RAIDSBCleanByUUID(nullptr, uuid.c_str()), 0);
+    for (const std::string &member : Partitions(3, 1, 4))
+        EXPECT_FALSE(HasSuperblock(member)) << member;
+    for (const std::string &member : Partitions(1))
+        EXPECT_TRUE(HasSuperblock(member)) << member;
+    EXPECT_EQ(StatusOf("/dev/md0"), RAID_STATUS_NORMAL);
+
+    EXPECT_EQ(RAIDRemoveMultiple(test::ListOf({"/dev/md0", "/dev/md7", "/dev/md1"}).get()), 0);
+    EXPECT_THAT(Told("cat /proc/mdstat"), testing::Not(HasSubstr("md")));
+    for (const std::string &member : Partitions(1))
+        EXPECT_FALSE(HasSuperblock(member)) << member;
+}
+
+TEST_F(MachineArrays, EveryLevelIsMadeReadAndRemoved)
+{
+    const struct {
+        int level;
+        int members, slots, spares;
+        int status;
+        unsigned data;  // members' worth of room
+    } rows[] = {
+        {RAID_LEVEL_0, 3, 3, 0, RAID_STATUS_NORMAL, 3},   {RAID_LEVEL_LINEAR, 2, 2, 0, RAID_STATUS_NORMAL, 2},
+        {RAID_LEVEL_1, 2, 2, 0, RAID_STATUS_NORMAL, 1},   {RAID_LEVEL_1, 1, 1, 0, RAID_STATUS_NORMAL, 1},
+        {RAID_LEVEL_10, 4, 4, 0, RAID_STATUS_NORMAL, 2},  {RAID_LEVEL_10, 3, 4, 0, RAID_STATUS_DEGRADED, 2},
+        {RAID_LEVEL_5, 4, 3, 1, RAID_STATUS_NORMAL, 2},   {RAID_LEVEL_6, 4, 4, 0, RAID_STATUS_NORMAL, 2},
+        {RAID_LEVEL_6, 2, 4, 0, RAID_STATUS_DEGRADED, 2},
+    };
+    for (const auto &row : rows) {
+        SCOPED_TRACE("level " + std::to_string(row.level) + ", " + std::to_string(row.members) + " members");
+        std::vector<std::string> members;
+        for (int bay = 1; bay <= row.members; ++bay)
+            members.push_back(Disk(bay));
+        // RAID 0 and linear know no size to use of each.
+        const bool sized = row.level != RAID_LEVEL_0 && row.level != RAID_LEVEL_LINEAR;
+        ASSERT_EQ(Make({.path = "/dev/md5",
+                        .level = row.level,
+                        .members = members,
+                        .slots = row.slots,
+                        .spares = row.spares,
+                        .mib = sized ? 32u : 0u,
+                        .sync = false}),
+                  0);
+        const Array array = ReadArray("/dev/md5");
+        ASSERT_TRUE(array);
+        EXPECT_EQ(array->fLevel, row.level);
+        EXPECT_EQ(array->nStatus, row.status);
+        EXPECT_EQ(array->nSlot, row.slots);
+        EXPECT_EQ(array->nWorking, row.members);
+        EXPECT_EQ(RAIDDiskCount(array->pMembers, RAID_MEMBER_SPARE), row.spares);
+        const uint64_t unit = sized ? 32u << 20 : 90u << 20;
+        EXPECT_GE(array->cbArray, row.data * unit);
+        EXPECT_LE(array->cbArray, row.data * (sized ? unit : 96u << 20));
+        EXPECT_EQ(Told("blockdev --getsize64 /dev/md5"), std::to_string(array->cbArray) + "\n");
+        EXPECT_EQ(RAIDRemove(array.get()), 0);
+        EXPECT_FALSE(ReadArray("/dev/md5"));
+        for (const std::string &member : members)
+            EXPECT_FALSE(HasSuperblock(member)) << member;
+    }
+}
+
+TEST_F(MachineArrays, MembersFailAreRemovedAndReplaced)
+{
+    ASSERT_EQ(Make({.path = "/dev/md3", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .sync = false}), 0);
+    const Array array = ReadArray("/dev/md3");
+    // A member in sync stays.
+    EXPECT_EQ(RAIDRemoveDisk(array.get(), "/dev/sda"), -1);
+    EXPECT_EQ(MembersOf("/dev/md3", RAID_MEMBER_ACTIVE).size(), 2u);
+
+    Told("mdadm -q /dev/md3 --fail /dev/sdb");
+    EXPECT_THAT(MembersOf("/dev/md3", RAID_MEMBER_FAILED), ElementsAre("/dev/sdb"));
+    EXPECT_EQ(StatusOf("/dev/md3"), RAID_STATUS_DEGRADED);
+    EXPECT_EQ(RAIDRemoveDisk(array.get(), "/dev/sdb"), 0);
+    EXPECT_THAT(MembersOf("/dev/md3", ~0), ElementsAre("/dev/sda"));
+    EXPECT_THAT(Told("mdadm -D /dev/md3"), testing::Not(HasSubstr("/dev/sdb")));
+
+    EXPECT_EQ(RAIDAddRobustCheck(array.get(), "/dev/sdc"), 0);
+    EXPECT_TRUE(BecomesNormal("/dev/md3"));
+    EXPECT_THAT(MembersOf("/dev/md3", RAID_MEMBER_ACTIVE), ElementsAre("/dev/sda", "/dev/sdc"));
+
+    // A third slot for a third disk.
+    EXPECT_EQ(RAIDAdd(array.get(), "/dev/sdd"), 0);
+    EXPECT_THAT(MembersOf("/dev/md3", RAID_MEMBER_SPARE), ElementsAre("/dev/sdd"));
+    EXPECT_EQ(RAIDDevCountChange(array.get(), 3), 0);
+    EXPECT_TRUE(BecomesNormal("/dev/md3"));
+    EXPECT_EQ(ReadArray("/dev/md3")->nSlot, 3);
+
+    Told("dd if=/dev/zero of=/tmp/small bs=1M count=8 && losetup /dev/loop0 /tmp/small");
+    EXPECT_EQ(RAIDAddRobustCheck(array.get(), "/dev/loop0"), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_NOT_ENOUGH_SPACE);
+    EXPECT_EQ(RAIDAddRobustCheck(array.get(), "/dev/sdz"), -1);
+    Told("losetup -d /dev/loop0");
+}
+
+TEST_F(MachineArrays, StoppedArraysAreAssembledAgain)
+{
+    ASSERT_EQ(Make({.path = "/dev/md4", .level = RAID_LEVEL_5, .members = {"/dev/sdb", "/dev/sdc", "/dev/sdd"}}), 0);
+    EXPECT_TRUE(BecomesNormal("/dev/md4"));
+    Told("dd if=/dev/urandom of=/dev/md4 bs=1M count=4 conv=fsync");
+    const std::string sum = Told("head -c 4M /dev/md4 | md5sum");
+    const Array array = ReadArray("/dev/md4");
+    const std::string uuid = UuidOf("/dev/md4");
+    EXPECT_EQ(RAIDStop("/dev/md4"), 0);
+    EXPECT_FALSE(ReadArray("/dev/md4"));
+    EXPECT_EQ(RAIDAssemble("/dev/md4", "01234567:89abcdef:01234567:89abcdef"), -1);
+
+    EXPECT_EQ(RAIDAssemble("/dev/md4", uuid.c_str()), 0);
+    EXPECT_EQ(StatusOf("/dev/md4"), RAID_STATUS_NORMAL);
+    EXPECT_EQ(Told("head -c 4M /dev/md4 | md5sum"), sum);
+    EXPECT_EQ(UuidOf("/dev/md4"), uuid);
+
+    EXPECT_EQ(RAIDStop("/dev/md4"), 0);
+    EXPECT_EQ(RAIDAssembleByInfo(array.get()), 0);
+    EXPECT_EQ(MembersOf("/dev/md4", RAID_MEMBER_ACTIVE),
+              (std::vector<std::string>{"/dev/sdb", "/dev/sdc", "/dev/sdd"}));
+    EXPECT_EQ(Told("head -c 4M /dev/md4 | md5sum"), sum);
+}
+
+TEST_F(MachineArrays, Raid5BecomesRaid6)
+{
+    ASSERT_EQ(Make({.path = "/dev/md2",
+                    .level = RAID_LEVEL_5,
+                    .members = {"/dev/sda", "/dev/sdb", "/dev/sdc"},
+                    .mib = 32,
+                    .sync = false}),
+              0);
+    Told("dd if=/dev/urandom of=/dev/md2 bs=1M count=64 conv=fsync");
+    const std::string sum = Told("head -c 64M /dev/md2 | md5sum");
+    const Array array = ReadArray("/dev/md2");
+    EXPECT_EQ(RAIDMigrate2RAID6(array.get(), test::ListOf({"/dev/sdd"}).get()), 0);
+    EXPECT_EQ(ReadArray("/dev/md2")->fLevel, RAID_LEVEL_6);
+    EXPECT_TRUE(BecomesNormal("/dev/md2"));
+    EXPECT_EQ(ReadArray("/dev/md2")->nSlot, 4);
+
+    // Any two disks may go now.
+    Told("mdadm -q /dev/md2 --fail /dev/sda --fail /dev/sdb && echo 3 >/proc/sys/vm/drop_caches");
+    EXPECT_EQ(StatusOf("/dev/md2"), RAID_STATUS_DEGRADED);
+    EXPECT_EQ(Told("head -c 64M /dev/md2 | md5sum"), sum);
+    EXPECT_EQ(RAIDMigrate2RAID6(ReadArray("/dev/md2").get(), test::ListOf({"/dev/sde"}).get()), -1);
+}
+
+TEST_F(MachineArrays, RoomOnTheMembersIsSeen)
+{
+    ASSERT_EQ(
+        Make(
+            {.path = "/dev/md2", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .mib = 32, .sync = false}),
+        0);
+    uint64_t kib = 0;
+    EXPECT_EQ(RAIDExpansible(ReadArray("/dev/md2").get(), &kib), 1);
+    EXPECT_EQ(kib, 96u * 1024 - 1024);
+    uint64_t bytes = 0;
+    EXPECT_EQ(RAIDSizeUnallocGet(ReadArray("/dev/md2").get(), &bytes), 0);
+    EXPECT_EQ(bytes, uint64_t{95} << 20);
+    Told("mdadm -q --grow /dev/md2 --size=max --assume-clean");
+    EXPECT_GT(ReadArray("/dev/md2")->cbArray, 90u << 20);
+}
+
+TEST_F(MachineArrays, EnumeratesWhatRuns)
+{
+    EXPECT_EQ(Make({.path = "/dev/md9", .level = RAID_LEVEL_0, .members = {"/dev/sda", "/dev/sdb"}}), 0);
+    EXPECT_EQ(Make({.path = "/dev/md10", .level = RAID_LEVEL_LINEAR, .members = {"/dev/sdc", "/dev/sdd"}}), 0);
+    RAIDLIST *list = nullptr;
+    ASSERT_EQ(RAIDInfoEnum(&list), 2);
+    EXPECT_STREQ(list->pInfo->szPath, "/dev/md9");
+    EXPECT_STREQ(list->pNext->pInfo->szPath, "/dev/md10");
+    RAIDListFree(list);
+    EXPECT_EQ(RAIDAdd(ReadArray("/dev/md9").get(), "/dev/sde"), -1);
+    const uint64_t before = ReadArray("/dev/md10")->cbArray;
+    EXPECT_EQ(RAIDAdd(ReadArray("/dev/md10").get(), "/dev/sde"), 0);
+    EXPECT_GT(ReadArray("/dev/md10")->cbArray, before);
+    EXPECT_EQ(ReadArray("/dev/md10")->nSlot, 3);
+}
+
+}  // namespace

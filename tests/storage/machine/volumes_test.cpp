@@ -1,0 +1,124 @@
+// Real volumes on real arrays.
+#include "real_storage.h"
+
+#include <gmock/gmock.h>
+
+namespace {
+
+using test::Make;
+using test::ReadArray;
+using test::Shell;
+using test::Told;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::Not;
+
+using MachineVolumes = test::StorageTest;
+
+std::vector<std::string> PhysicalVolumes()
+{
+    LVMPVLIST *list = nullptr;
+    EXPECT_GE(LVMPvSBEnum(&list), 0);
+    std::vector<std::string> names;
+    for (const LVMPVLIST *node = list; node; node = node->pNext)
+        names.push_back(std::string(node->pv.szPv) + " " + node->pv.szVg);
+    LVMPvSBListFree(list);
+    return names;
+}
+
+TEST_F(MachineVolumes, AreMadeRenamedExpandedAndRemoved)
+{
+    ASSERT_EQ(
+        Make(
+            {.path = "/dev/md2", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .mib = 32, .sync = false}),
+        0);
+    ASSERT_EQ(Make({.path = "/dev/md3", .level = RAID_LEVEL_LINEAR, .members = {"/dev/sdc", "/dev/sdd"}}), 0);
+    EXPECT_EQ(LVMPvSBGet("/dev/md2", nullptr), -1);
+    LVMPV pv;
+    EXPECT_EQ(LVMPvSBGet("/dev/md2", &pv), 0);
+    LVMVG group;
+    EXPECT_EQ(LVMVgSBGet("/dev/vg1", &group), 0);
+
+    char uuid[256] = "";
+    ASSERT_EQ(LVMCreate(test::ListOf({"/dev/md2", "/dev/md3"}).get(), "/dev/vg1", "lv", uuid, sizeof uuid), 0);
+    EXPECT_THAT(PhysicalVolumes(), ElementsAre("/dev/md2 /dev/vg1", "/dev/md3 /dev/vg1"));
+    ASSERT_EQ(LVMVgSBGet("/dev/vg1", &group), 1);
+    EXPECT_STREQ(group.szUuid, uuid);
+    EXPECT_EQ(Told("vgs --noheading -o vg_uuid vg1 | tr -d ' '"), std::string(uuid) + "\n");
+    ASSERT_EQ(LVMPvSBGet("/dev/md3", &pv), 1);
+    EXPECT_EQ(pv.nPv, 2);
+    char volume[64] = "";
+    EXPECT_EQ(LVMGetLVPath("/dev/md2", volume, sizeof volume), 1);
+    EXPECT_STREQ(volume, "/dev/vg1/lv");
+    // All of it is used, and it can be written.
+    EXPECT_EQ(Told("vgs --noheading -o vg_free_count vg1 | tr -d ' '"), "0\n");
+    Told("mkfs.ext4 -q /dev/vg1/lv && mount /dev/vg1/lv /mnt && cp /bin/busybox /mnt && md5sum /mnt/busybox >/tmp/sum && umount /mnt");
+
+    ASSERT_EQ(LVMVgRename("/dev/vg1", nullptr, "vg2"), 0);
+    EXPECT_EQ(LVMVgSBGet("/dev/vg1", &group), 0);
+    ASSERT_EQ(LVMVgSBGet("/dev/vg2", &group), 1);
+    EXPECT_STREQ(group.szUuid, uuid);
+    ASSERT_EQ(LVMVgRename(nullptr, "vg2", "vg1"), 0);
+    Told("mount /dev/vg1/lv /mnt && md5sum -c /tmp/sum && umount /mnt");
+
+    // The array under it grows.
+    const auto size = [] {
+        return std::stoi(Told("pvs --noheading --units m --nosuffix -o pv_size /dev/md2"));
+    };
+    const int before = size();
+    Told("mdadm -q --grow /dev/md2 --size=max --assume-clean");
+    EXPECT_EQ(size(), before);
+    ASSERT_EQ(LVMVgSBGet("/dev/vg1", &group), 1);
+    LVMVGINFO *info = LVMVgInfoAlloc();
+    ASSERT_EQ(LVMVgSB2Info(&group, info), 0);
+    EXPECT_EQ(info->nPv, 2);
+    EXPECT_EQ(LVMPvExpand(info), 0);
+    LVMVgInfoFree(info);
+    EXPECT_GT(size(), before + 40);
+
+    EXPECT_EQ(LVMRemove("/dev/vg1", "lv"), 0);
+    EXPECT_EQ(LVMGetLVPath("/dev/md2", volume, sizeof volume), 0);
+    EXPECT_EQ(LVMVgRemove("/dev/vg1"), 0);
+    EXPECT_EQ(LVMVgSBGet("/dev/vg1", &group), 0);
+    EXPECT_THAT(PhysicalVolumes(), ElementsAre("/dev/md2 ", "/dev/md3 "));
+    EXPECT_EQ(LVMPvRemove("/dev/md2"), 0);
+    EXPECT_EQ(LVMPvRemove("/dev/md3"), 0);
+    EXPECT_THAT(PhysicalVolumes(), ElementsAre());
+
+}
+
+TEST_F(MachineVolumes, ADevicesVolumeGoesWithItsMountedSnapshots)
+{
+    ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .sync = false}), 0);
+    ASSERT_EQ(Make({.path = "/dev/md22", .level = RAID_LEVEL_1, .members = {"/dev/sdc", "/dev/sdd"}, .sync = false}),
+              0);
+    Told("pvcreate -q /dev/md2 && vgcreate -q vg1 /dev/md2 && lvcreate -q -W n -L 40M -n lv vg1 && mkfs.ext4 -q "
+         "/dev/vg1/lv "
+         "&& lvcreate -q -s -L 8M -n lvs1 vg1/lv && mkdir -p /mnt/shot && mount -o ro,noload /dev/vg1/lvs1 /mnt/shot");
+    // A device whose name begins with this one's, and a volume whose name does.
+    Told("pvcreate -q /dev/md22 && vgcreate -q vg2 /dev/md22 && lvcreate -q -W n -L 40M -n lvsecond vg2 && "
+         "mkfs.ext4 -q /dev/vg2/lvsecond && mkdir -p /mnt/other && mount /dev/vg2/lvsecond /mnt/other");
+    EXPECT_EQ(LVMRemoveLV("/dev/md2"), 0);
+    EXPECT_THAT(PhysicalVolumes(), ElementsAre("/dev/md22 /dev/vg2"));
+    EXPECT_THAT(Told("cat /proc/mounts"), Not(HasSubstr("/mnt/shot")));
+    EXPECT_THAT(Told("cat /proc/mounts"), HasSubstr("/mnt/other"));
+    EXPECT_NE(Shell("ls -d /mnt/shot").status, 0);
+    Told("echo x >/mnt/other/file && umount /mnt/other");
+}
+
+TEST_F(MachineVolumes, StrayPhysicalVolumesAreCleanedAndArraysAreNot)
+{
+    ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .sync = false}), 0);
+    ASSERT_EQ(LVMCreate(test::ListOf({"/dev/md2"}).get(), "/dev/vg1", "lv", nullptr, 0), 0);
+    Told("pvcreate -q /dev/sdc /dev/sdd /dev/sde && vgcreate -q vg7 /dev/sdd && lvcreate -q -W n -l100%VG -n lv vg7");
+    // One that is mounted stays.
+    Told("vgcreate -q vg8 /dev/sde && lvcreate -q -W n -l100%VG -n lv vg8 && mkfs.ext4 -q /dev/vg8/lv && mount "
+         "/dev/vg8/lv /mnt");
+    EXPECT_EQ(LVMCleanIllegal(), 0);
+    EXPECT_THAT(PhysicalVolumes(), testing::UnorderedElementsAre("/dev/md2 /dev/vg1", "/dev/sde /dev/vg8"));
+    Told("umount /mnt");
+    EXPECT_EQ(LVMCleanIllegal(), 0);
+    EXPECT_THAT(PhysicalVolumes(), ElementsAre("/dev/md2 /dev/vg1"));
+}
+
+}  // namespace

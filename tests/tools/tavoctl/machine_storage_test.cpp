@@ -1,0 +1,167 @@
+// tavoctl disk, partition, raid and lvm on real disks: what is shown is what is there, and nothing in use is destroyed.
+#include "run_tavoctl.h"
+
+#include "support/machine.h"
+
+#include <gmock/gmock.h>
+#include <nlohmann/json.hpp>
+
+namespace {
+
+using nlohmann::json;
+using test::Ran;
+using test::Shell;
+using test::Tavoctl;
+using test::Told;
+using test::Words;
+using testing::HasSubstr;
+
+class MachineTavoctl : public test::MachineTest {
+  protected:
+    void TearDown() override
+    {
+        if (test::OnMachine())
+            Told("umount /mnt 2>/dev/null; swapoff -a; /usr/lib/tavo-machine/reset");
+    }
+};
+
+json Facts(Words words)
+{
+    words.insert(words.begin() + 2, "--json");
+    const Ran ran = Tavoctl(words);
+    EXPECT_EQ(ran.status, 0) << testing::PrintToString(words) << ran;
+    return json::parse(ran.out, nullptr, false);
+}
+
+void Succeeds(const Words &words)
+{
+    const Ran ran = Tavoctl(words);
+    EXPECT_EQ(ran.status, 0) << testing::PrintToString(words) << ran;
+    EXPECT_EQ(ran.out + ran.err, "");
+}
+
+void IsRefused(const Words &words, const char *reason)
+{
+    const Ran ran = Tavoctl(words);
+    EXPECT_EQ(ran.status, 4) << testing::PrintToString(words) << ran;
+    EXPECT_THAT(ran.err, HasSubstr(reason)) << testing::PrintToString(words);
+}
+
+TEST_F(MachineTavoctl, ShowsTheDisks)
+{
+    const json disks = Facts({"disk", "list"});
+    ASSERT_EQ(disks.size(), 6u);
+    for (std::size_t i = 0; i < 6; ++i) {
+        EXPECT_EQ(disks[i].at("bay"), std::to_string(i + 1));
+        EXPECT_EQ(disks[i].at("disk"), std::string("sd") + "abcdef"[i]);
+        EXPECT_EQ(disks[i].at("model"), "NASLAB-HD-" + std::to_string(i + 1));
+        EXPECT_EQ(disks[i].at("size"), 96 << 20);
+        EXPECT_EQ(disks[i].at("state"), "spinning");
+        EXPECT_EQ(disks[i].at("layout"), "blank");
+        EXPECT_EQ(disks[i].at("temperature"), nullptr);
+        EXPECT_EQ(disks[i].at("role"), json::array());
+    }
+    EXPECT_EQ(Tavoctl({"disk", "temperature", "sda"}).status, 1);
+    const json smart = Facts({"disk", "smart", "sda"});
+    ASSERT_EQ(smart.size(), 7u);
+    EXPECT_EQ(smart[6].at("name"), "airflow temperature");
+    EXPECT_EQ(smart[6].at("raw"), 31);
+    EXPECT_EQ(smart[6].at("threshold"), 50);
+    EXPECT_EQ(smart[6].at("state"), "good");
+
+    Succeeds({"disk", "cache", "sda", "off"});
+    EXPECT_EQ(Facts({"disk", "info", "sda"}).at("write_cache"), false);
+    Succeeds({"disk", "cache", "sda", "on"});
+    EXPECT_EQ(Facts({"disk", "info", "sda"}).at("write_cache"), true);
+    Succeeds({"disk", "standby", "--yes", "sdf"});
+    Succeeds({"disk", "standby", "--yes", "--timer", "20"});
+    test::Happen("pull 2");
+    EXPECT_EQ(Facts({"disk", "list"}).size(), 5u);
+    EXPECT_EQ(Tavoctl({"disk", "info", "sdb"}).status, 3);
+}
+
+TEST_F(MachineTavoctl, BringsADiskFromBlankToVolumeAndBack)
+{
+    for (const char *bay : {"1", "2", "3"}) {
+        test::Happen(std::string("pull ") + bay);
+        test::Happen(std::string("plug ") + bay + " --blank 4736");
+    }
+    for (const char *disk : {"sda", "sdb", "sdc"}) {
+        Succeeds({"partition", "create", "--yes", "--system", disk});
+        Succeeds({"partition", "create", "--yes", "--data", disk});
+    }
+    EXPECT_EQ(Facts({"partition", "layout", "sda"}), (json{{"disk", "/dev/sda"}, {"version", 7}, {"raid", true}}));
+    EXPECT_EQ(Tavoctl({"partition", "table", "sda"}).out, "mbr\n");
+    const json partitions = Facts({"partition", "list", "sda"});
+    ASSERT_EQ(partitions.size(), 3u);
+    EXPECT_EQ(partitions[1].at("partition"), "sda2");
+    EXPECT_EQ(partitions[1].at("start"), 4980736);
+    EXPECT_EQ(partitions[1].at("sectors"), 4194304);
+    EXPECT_EQ(partitions[1].at("type"), "0xFD");
+    EXPECT_EQ(Tavoctl({"partition", "create", "--yes", "--data", "sda"}).status, 1);
+
+    Succeeds({"raid", "create", "--yes", "--level", "5", "--slots", "3", "--size", "64", "md2", "sda3", "sdb3"});
+    EXPECT_EQ(Facts({"raid", "info", "md2"}).at("status"), "degraded");
+    EXPECT_EQ(Tavoctl({"raid", "wait", "md2"}).status, 1);
+    IsRefused({"raid", "create", "--yes", "--level", "1", "md3", "sda3", "sdc3"}, "/dev/sda3 belongs to /dev/md2");
+    IsRefused({"partition", "create", "--yes", "--system", "sdb"}, "/dev/sdb3 belongs to /dev/md2");
+    IsRefused({"partition", "clean", "--yes", "--data", "sdb"}, "/dev/sdb3 belongs to /dev/md2");
+    IsRefused({"raid", "erase", "--yes", "sdb3"}, "belongs to /dev/md2");
+    Succeeds({"raid", "add", "--yes", "md2", "sdc3"});
+    Succeeds({"raid", "wait", "--timeout", "120", "md2"});
+    const json array = Facts({"raid", "list"}).at(0);
+    EXPECT_EQ(array.at("status"), "normal");
+    EXPECT_EQ(array.at("size"), 128 << 20);
+    EXPECT_EQ(array.at("members"), json({"sda3", "sdb3", "sdc3"}));
+    EXPECT_EQ(Facts({"disk", "info", "sda"}).at("role"), json({"md2"}));
+    EXPECT_EQ(Facts({"disk", "list"}).at(0).at("layout"), "version 7");
+    const std::string uuid = Facts({"raid", "info", "md2"}).at("uuid");
+    EXPECT_EQ(Facts({"raid", "superblock", "sdb3"}).at(0).at("uuid"), uuid);
+
+    Succeeds({"lvm", "create", "--yes", "vg1", "md2"});
+    IsRefused({"raid", "stop", "--yes", "md2"}, "/dev/md2 belongs to the volume vg1-lv");
+    Told("mkfs.ext4 -q /dev/vg1/lv && mount /dev/vg1/lv /mnt");
+    EXPECT_EQ(Facts({"lvm", "list"}).at(0).at("use"), "/dev/vg1/lv is mounted on /mnt");
+    IsRefused({"lvm", "remove", "--yes", "vg1"}, "/dev/vg1/lv is mounted on /mnt");
+    IsRefused({"raid", "remove", "--yes", "md2"}, "belongs to the volume");
+    Told("echo x >/mnt/file && umount /mnt");
+    Succeeds({"lvm", "rename", "vg1", "vg2"});
+    Succeeds({"lvm", "expand", "vg2"});
+    Succeeds({"lvm", "remove", "--yes", "vg2"});
+    EXPECT_EQ(Facts({"lvm", "list"}), json::array());
+
+    Succeeds({"raid", "stop", "--yes", "md2"});
+    Succeeds({"raid", "assemble", "md2", uuid});
+    IsRefused({"raid", "erase", "--yes", "--uuid", uuid}, "/dev/md2 runs");
+    Told("mkswap /dev/sda2 && swapon /dev/sda2");
+    IsRefused({"partition", "create", "--yes", "--system", "sda"}, "/dev/sda2 is swap space");
+    Told("swapoff /dev/sda2");
+    Succeeds({"raid", "remove", "--yes", "md2"});
+    EXPECT_EQ(Tavoctl({"raid", "superblock", "sda3", "sdb3", "sdc3"}).status, 3);
+    Succeeds({"partition", "clean", "--yes", "--system", "sda"});
+    EXPECT_EQ(Facts({"partition", "list", "sda"}), json::array());
+}
+
+TEST_F(MachineTavoctl, ShowsHowFarARebuildIs)
+{
+    Succeeds({"raid", "create", "--yes", "--level", "1", "--slots", "2", "md4", "sda"});
+    Told("echo 400 >/sys/block/md4/md/sync_speed_max && echo 200 >/sys/block/md4/md/sync_speed_min");
+    Succeeds({"raid", "add", "--yes", "md4", "sdb"});
+    EXPECT_EQ(Tavoctl({"raid", "wait", "--timeout", "2", "md4"}).status, 4);
+    const json array = Facts({"raid", "info", "md4"});
+    EXPECT_EQ(array.at("action"), "recover");
+    EXPECT_LT(array.at("percent"), 100);
+    EXPECT_EQ(array.at("spare"), json({"/dev/sdb"}));
+    const Ran seen = test::TavoctlAtTerminal({"raid", "wait", "--timeout", "3", "md4"});
+    EXPECT_THAT(seen.out, testing::ContainsRegex("md4: recover [0-9]+ %, [0-9.]+ MiB/s, .* left"));
+    Told("echo 200000 >/sys/block/md4/md/sync_speed_max");
+    Succeeds({"raid", "wait", "--timeout", "120", "md4"});
+
+    Told("mdadm -q /dev/md4 --fail /dev/sdb");
+    IsRefused({"raid", "remove", "--yes", "md4", "sda"}, "is in sync");
+    Succeeds({"raid", "remove", "--yes", "md4", "sdb"});
+    EXPECT_EQ(Facts({"raid", "info", "md4"}).at("active"), json({"/dev/sda"}));
+    EXPECT_EQ(Tavoctl({"raid", "remove", "--yes", "md4", "sdf"}).status, 3);
+}
+
+}  // namespace
