@@ -6,6 +6,7 @@
 #include <gmock/gmock.h>
 
 #include <cstdio>
+#include <sstream>
 #include <string>
 
 namespace {
@@ -40,8 +41,29 @@ std::string Joined(const Ids &ids)
     return text.empty() ? "-" : text;
 }
 
+std::string Capabilities(const tavo::ServiceShareRow &row)
+{
+    std::string text;
+    for (const char *key : row.capability_keys) {
+        if (key)
+            text += (text.empty() ? "" : ", ") + Code(key);
+    }
+    return text.empty() ? "-" : text;
+}
+
+// Lines of the page that begin a row of a table: "| 7 | ...".
+size_t RowsOfThePage()
+{
+    size_t count = 0;
+    std::istringstream page(kPage);
+    for (std::string line; std::getline(page, line);)
+        count += line.size() > 2 && line.starts_with("| ") && line[2] >= '0' && line[2] <= '9';
+    return count;
+}
+
 TEST(ServiceTables, ArePrintedInThePage)
 {
+    EXPECT_EQ(RowsOfThePage(), static_cast<size_t>(tavo::kServices + tavo::kServiceShares - 1));
     for (int id = 0; id < tavo::kServices; ++id) {
         const TAVOSERVICE &row = tavo::service_table[id];
         EXPECT_THAT(kPage, testing::HasSubstr("\n| " + std::to_string(id) + " | " + Code(row.szName) + " | " +
@@ -51,11 +73,12 @@ TEST(ServiceTables, ArePrintedInThePage)
     }
     constexpr const char *namings[] = {"@%s", "%s", "@database/%s"};
     for (int id = 1; id < tavo::kServiceShares; ++id) {
-        const TAVOSERVICESHARE &row = tavo::service_share_table[id].share;
+        const tavo::ServiceShareRow &whole = tavo::service_share_table[id];
+        const TAVOSERVICESHARE &row = whole.share;
         EXPECT_THAT(kPage, testing::HasSubstr("\n| " + std::to_string(id) + " | " + Code(row.szShare) + " | " +
                                               Code(row.szLink) + " | " + Code(row.szEnableKey) + " | " +
                                               (row.fSupported ? "yes" : "by the model") + " | " +
-                                              Code(namings[row.nNaming]) + " | "));
+                                              Code(namings[row.nNaming]) + " | " + Capabilities(whole) + " |\n"));
     }
 }
 

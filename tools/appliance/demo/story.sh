@@ -6,7 +6,7 @@ set -eu
 export PATH=/usr/sbin:/usr/bin:/sbin:/bin
 
 here=${0%/*}
-all='conf section lock proc error disk partition raid lvm user group quota net discover service'
+all='conf section lock proc error disk partition raid lvm volume user group quota net discover service'
 
 say() { printf '\n\033[1m%s\033[0m\n' "$*"; }
 
