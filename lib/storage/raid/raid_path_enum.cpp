@@ -20,7 +20,11 @@ class Arrays {
     Arrays(const Arrays &) = delete;
     Arrays &operator=(const Arrays &) = delete;
 
-    bool Failed() const { return error_ != 0 && error_ != GLOB_NOMATCH; }
+    // 0, or the code of what went wrong.
+    int Code() const
+    {
+        return error_ == 0 || error_ == GLOB_NOMATCH ? 0 : error_ == GLOB_NOSPACE ? ERR_OUT_OF_MEMORY : ERR_OPEN_FAILED;
+    }
 
     // Ascending; a device that holds no array (any more) is "clear".
     std::vector<int> Numbers() const
@@ -51,8 +55,8 @@ extern "C" int RAIDPathEnum(TLIBSZLIST **ppList)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         const Arrays arrays;
-        if (arrays.Failed())
-            return Fail(ERR_OPEN_FAILED);
+        if (arrays.Code() != 0)
+            return Fail(arrays.Code());
         const std::vector<int> numbers = arrays.Numbers();
         for (const int number : numbers) {
             if (TLIBSzListPush(ppList, (std::string(tavo::kArray) + std::to_string(number)).c_str()) < 0)
