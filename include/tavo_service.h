@@ -209,7 +209,8 @@ TAVO_API int TAVOServiceiTunesStatus(const TAVOSERVICE *pService);
 /* Stops, starts, restarts or reloads the daemons of fDaemon (TAVO_DAEMON_*) in a fixed order, under the locks of the
  * settings file, of Samba and of the Apple services (0x1846, at most 5 s), which are held until the last script has
  * ended: a start script must not call a function that takes one of them, or it waits for its own time-out and fails.
- * With both web servers the user's is stopped, the system's restarted and the user's started again.
+ * With both web servers in fDaemon, whatever the operation, the user's is stopped, the system's restarted and the user's
+ * started again.
  * Returns the bits whose commands succeeded (0x40000000 stands for the system web server), 0 when none did, or -1 with
  *   ERR_BAD_PARAMETERS  no daemon or no such operation
  *   ERR_LOCK_FAILED     another process is switching services, or changing one of those files */

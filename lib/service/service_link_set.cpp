@@ -15,7 +15,7 @@ constexpr const char *kLinkFolder = "/var/services";
 bool IsDirectory(const char *path)
 {
     struct stat st;
-    return ::lstat(path, &st) == 0 && S_ISDIR(st.st_mode);
+    return ::stat(path, &st) == 0 && S_ISDIR(st.st_mode);
 }
 
 // Whatever else stands in the folder's place goes; the caller's umask shapes the mode, so that the folder is not open

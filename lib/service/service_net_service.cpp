@@ -88,7 +88,7 @@ class Dispatch {
         if (stack && ControlDatabaseStack(operation_))
             done_ |= TAVO_DAEMON_DATABASE;
         One(TAVO_DAEMON_NETBKP);
-        if ((mask_ & kBothWebs) == kBothWebs && operation_ != TAVO_DAEMON_STOP) {
+        if ((mask_ & kBothWebs) == kBothWebs) {
             BothWebs();
         } else {
             One(TAVO_DAEMON_WEB_SYSTEM);
@@ -106,7 +106,9 @@ class Dispatch {
             Note(daemon, tavo::ControlDaemon(daemon, operation_));
     }
 
-    // The two servers share a port range and modules: the user's is away while the system's restarts.
+    // The two servers share a port range and modules: the user's is away while the system's restarts. Whoever asks for
+    // both wants that, whatever the operation; the management pages themselves come from the system's, so it is stopped
+    // only when it is asked for alone.
     void BothWebs()
     {
         const bool stopped = tavo::ControlDaemon(TAVO_DAEMON_WEB_USER, TAVO_DAEMON_STOP);

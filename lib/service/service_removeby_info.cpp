@@ -6,13 +6,15 @@
 #include "service/detail/settings_files.h"
 
 #include <algorithm>
+#include <string_view>
 
 namespace {
 
 bool IsUsedByAnother(const TAVOSERVICE &service, int32_t share)
 {
     return std::any_of(tavo::service_table, tavo::service_table + tavo::kServices, [&](const TAVOSERVICE &other) {
-        return &other != &service && tavo::UsesShare(other, share) && tavo::IsSwitchedOn(other);
+        return std::string_view(other.szName) != service.szName && tavo::UsesShare(other, share) &&
+               tavo::IsSwitchedOn(other);
     });
 }
 

@@ -38,7 +38,8 @@ extern "C" int TAVOServiceSettingGet(int idShare, TAVOSERVICESHARE *pShare)
         TLIBErrSet(ERR_SUCCESS);
         const int type = tavo::VolumeType(share.szVolumePath);
         if (type < 0)
-            LogError("%s:%d Failed to check volume type: path=[%s], tavoerr=0x%04X", share.szVolumePath, TLIBErrGet());
+            LogError("%s:%d Failed to check volume type: path=[%s], tavoerr=0x%04X", share.szVolumePath,
+                     static_cast<int>(ERR_NO_VOLUME_ID));
         share.fSpecialVolume = IsSpecial(type);
     }
     *pShare = share;

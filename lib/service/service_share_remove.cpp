@@ -2,12 +2,27 @@
 #include "tavo_service.h"
 
 #include "core/detail/guard.h"
+#include "service/detail/data_folder.h"
 #include "service/detail/service_table.h"
 #include "service/detail/share_file.h"
 #include "service/detail/volume_list.h"
 
 #include <filesystem>
 #include <string>
+
+namespace {
+
+// Who may write to the volume must not choose what root deletes.
+bool IsBehindNoLink(const std::string &path)
+{
+    for (size_t slash = path.find('/', 1); slash != std::string::npos; slash = path.find('/', slash + 1)) {
+        if (!tavo::IsRealFolder(path.substr(0, slash).c_str()))
+            return false;
+    }
+    return true;
+}
+
+}  // namespace
 
 extern "C" int TAVOServiceShareRemove(int idShare, int fDelete)
 {
@@ -20,7 +35,7 @@ extern "C" int TAVOServiceShareRemove(int idShare, int fDelete)
         std::string path;
         // A record that points outside the volumes was not made here, and nothing is deleted for it.
         if (fDelete && tavo::SharePath(share.szShareName, path) == 0 && !tavo::VolumeOf(path).empty() &&
-            path.find("/../") == std::string::npos && path.ends_with(share.szShare)) {
+            path.find("/../") == std::string::npos && path.ends_with(share.szShareName) && IsBehindNoLink(path)) {
             std::error_code failed;
             std::filesystem::remove_all(path, failed);  // deletes links, never follows them
             if (failed)

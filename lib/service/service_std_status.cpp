@@ -6,6 +6,7 @@
 #include "tavo_proc.h"
 
 #include "core/detail/fault.h"
+#include "core/detail/keep_fault.h"
 #include "service/detail/process_named.h"
 #include "service/detail/service_table.h"
 #include "service/detail/settings_files.h"
@@ -19,6 +20,12 @@ constexpr int kLockSeconds = 5;
 
 enum class Enabled { no, yes, unknown };
 
+bool IsNo(const char *key)
+{
+    const tavo::KeepFault keep;
+    return BlTAVOFileCheckKeyValue(tavo::kSettings, key, "no");
+}
+
 // Only a "no" switches a service off: one whose key was never written runs.
 Enabled IsEnabled(const char *key)
 {
@@ -26,7 +33,7 @@ Enabled IsEnabled(const char *key)
         return Enabled::yes;
     if (ErrTLIBFileLock(kSettingsLock | 5, kLockSeconds) != 0)
         return Enabled::unknown;
-    const bool no = tavo::SettingIs(tavo::kSettings, key, "no");
+    const bool no = IsNo(key);
     if (ErrTLIBFileUnlock(kSettingsLock) != 0)
         return Enabled::unknown;
     return no ? Enabled::no : Enabled::yes;

@@ -38,8 +38,10 @@ int MakeHomes()
 {
     const tavo::Fd homes(::open(kHomes, O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     tavo::ListOwner users(PslTLIBSzListAlloc(0));
-    if (!homes || !users)
-        return -1;
+    if (!homes)
+        return Fail(ERR_OPEN_FAILED);
+    if (!users)
+        return Fail(ERR_OUT_OF_MEMORY);
     if (TAVOUserEnum(users.Addr(), TAVO_USER_LOCAL) < 0)
         return -1;
     for (int i = 0; i < users->nItem; ++i)

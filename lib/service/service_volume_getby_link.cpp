@@ -43,7 +43,7 @@ extern "C" int TAVOServiceVolumeGetbyLink(const char *szLink, char *szVolume, in
     std::memset(szPath, 0, static_cast<size_t>(cbPath));
 
     const ssize_t length = ::readlink(szLink, szVolume, static_cast<size_t>(cbVolume));
-    if (length < 0 && errno == ENOENT)
+    if (length < 0 && (errno == ENOENT || errno == ENOTDIR))
         return 0;
     // A target that fills the buffer was cut: it would name another folder.
     if (length < 0 || length == cbVolume) {
@@ -56,5 +56,5 @@ extern "C" int TAVOServiceVolumeGetbyLink(const char *szLink, char *szVolume, in
     const std::string_view path = VolumePath(szVolume);
     if (path.size() < static_cast<size_t>(cbPath))
         std::memcpy(szPath, path.data(), path.size());
-    return IsFolder(szVolume) ? 1 : 0;
+    return IsFolder(szLink) ? 1 : 0;  // as the kernel follows it, also from another directory
 }

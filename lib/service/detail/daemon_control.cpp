@@ -80,7 +80,7 @@ bool ReloadNfs()
 struct Daemon {
     uint32_t bit;
     const char *script;  // NULL: none
-    bool (*reload)();    // NULL: a hang-up to the pid file of its service row
+    bool (*reload)();    // NULL: a hang-up to the process of its service row
     bool (*stop)();      // NULL: the script
 };
 
@@ -121,8 +121,11 @@ bool RunScript(const char *script, int operation)
 bool HangUp(uint32_t bit)
 {
     for (const TAVOSERVICE &service : service_table) {
-        if (service.fDaemon == bit && service.szProc && std::strchr(service.szProc, '/'))
+        if (service.fDaemon != bit || !service.szProc)
+            continue;
+        if (std::strchr(service.szProc, '/'))
             return TLIBProcSignalByPidFile(service.szProc, SIGHUP) == 0;
+        return TLIBExec("/usr/bin/killall", "-HUP", service.szProc, nullptr) == 0;
     }
     return false;
 }

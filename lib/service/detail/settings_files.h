@@ -5,6 +5,8 @@
 #include "tavo_file.h"
 #include "tavo_service.h"
 
+#include "core/detail/keep_fault.h"
+
 #include <strings.h>
 
 namespace tavo {
@@ -16,6 +18,7 @@ inline constexpr const char *kFactorySettings = "/etc.defaults/tavoinfo.conf";  
 inline bool SettingIs(const char *file, const char *key, const char *word) noexcept
 {
     char value[8];
+    const KeepFault keep;  // a key that is not there is an answer
     return TLIBFileGetKeyValue(file, key, value, sizeof value, 0) > 0 && ::strcasecmp(value, word) == 0;
 }
 

@@ -20,6 +20,7 @@
 #include <string>
 #include <vector>
 
+#include <pwd.h>
 #include <sys/mount.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -153,19 +154,38 @@ TEST(NetService, RestartsTheWebServersAroundEachOther)
     EXPECT_EQ(TAVONetService(TAVO_DAEMON_WEB_SYSTEM, TAVO_DAEMON_START), 0x40000000)
         << "the highest bit would make the result a failure";
     EXPECT_THAT(ScriptCalls(), ElementsAre("S97apache-sys.sh start"));
-    EXPECT_EQ(TAVONetService(TAVO_DAEMON_WEB_SYSTEM | TAVO_DAEMON_WEB_USER, TAVO_DAEMON_RESTART), 0x40000040);
-    EXPECT_THAT(ScriptCalls(),
-                ElementsAre("S97apache-user.sh stop", "S97apache-sys.sh restart", "S97apache-user.sh start"));
+    for (const int operation : {TAVO_DAEMON_RESTART, TAVO_DAEMON_START, TAVO_DAEMON_STOP, TAVO_DAEMON_RELOAD}) {
+        EXPECT_EQ(TAVONetService(TAVO_DAEMON_WEB_SYSTEM | TAVO_DAEMON_WEB_USER, operation), 0x40000040);
+        EXPECT_THAT(ScriptCalls(),
+                    ElementsAre("S97apache-user.sh stop", "S97apache-sys.sh restart", "S97apache-user.sh start"))
+            << operation;
+    }
 }
 
 TEST(NetService, ReloadsBySignal)
 {
-    ASSERT_EQ(TAVONetService(TAVO_DAEMON_WEB_USER | TAVO_DAEMON_SMB, TAVO_DAEMON_START), 0x44);
-    EXPECT_EQ(TAVONetService(TAVO_DAEMON_WEB_USER | TAVO_DAEMON_SMB, TAVO_DAEMON_RELOAD), 0x44);
-    ::usleep(100000);
-    for (const char *daemon : {"httpd-user", "smbd", "nmbd"})
-        EXPECT_THAT(test::ReadFile(std::string("/var/standin/") + daemon + ".log"), testing::HasSubstr("signal 1\n"));
+    const int mask = TAVO_DAEMON_WEB_USER | TAVO_DAEMON_SMB | TAVO_DAEMON_AFP | TAVO_DAEMON_FTP | TAVO_DAEMON_CRON |
+                     TAVO_DAEMON_WEBDAV | TAVO_DAEMON_MEDIA | TAVO_DAEMON_ISCSI;
+    ASSERT_EQ(TLIBFileSetKeyValue("/etc/tavoinfo.conf", "runafp", "yes", nullptr), 1);
+    EXPECT_EQ(TAVONetService(mask, TAVO_DAEMON_RELOAD), 0) << "nothing runs";
+    ASSERT_EQ(TAVONetService(mask, TAVO_DAEMON_START), mask);
+    EXPECT_EQ(TAVONetService(mask, TAVO_DAEMON_RELOAD), mask);
+    for (const char *daemon :
+         {"httpd-user", "smbd", "nmbd", "afpd", "papd", "ftpd", "crond", "httpd-webdav", "dms", "iscsi_trgt"}) {
+        const std::string log = std::string("/var/standin/") + daemon + ".log";
+        EXPECT_TRUE(test::Soon([&] { return test::ReadFile(log).find("signal 1\n") != std::string::npos; })) << daemon;
+    }
+    // The server reports itself running only while it is enabled.
+    ASSERT_EQ(TLIBFileSetKeyValue("/etc/tavoinfo.conf", "runafp", "no", nullptr), 1);
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_AFP, TAVO_DAEMON_RELOAD), 0);
+
     EXPECT_EQ(TAVONetService(TAVO_DAEMON_NFS, TAVO_DAEMON_RELOAD), 0) << "there is no server to re-export for";
+    ASSERT_EQ(TAVONetService(TAVO_DAEMON_NFS, TAVO_DAEMON_START), static_cast<int>(TAVO_DAEMON_NFS));
+    ScriptCalls();
+    test::Scenario scenario;
+    scenario.Expect({"/usr/sbin/exportfs", "-ra"}).Exits(0);
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_NFS, TAVO_DAEMON_RELOAD), static_cast<int>(TAVO_DAEMON_NFS));
+    EXPECT_THAT(ScriptCalls(), IsEmpty());
 }
 
 // A pid file with anything but one number in it, or one that somebody else could have written, would make the reload
@@ -403,6 +423,123 @@ TEST_F(Services, NothingButALinkIsReplaced)
     EXPECT_EQ(test::ReadFile("/volume1/elsewhere/kept"), "x");
 }
 
+// A folder that another enabled service uses stays bound, for a caller's copy of the row as for the row itself.
+TEST_F(Services, SharedFoldersAreReleasedByTheLast)
+{
+    ASSERT_EQ(TAVOServiceActionSet(5, TAVO_SERVICE_ENABLE), 0);
+    ASSERT_EQ(TAVOServiceActionSet(6, TAVO_SERVICE_ENABLE), 0);
+    const TAVOSERVICE audio = *TAVOServiceInfoGet(5);
+    EXPECT_EQ(TAVOServiceRemovebyInfo(&audio, 0), 0);
+    EXPECT_EQ(LinkTarget("/var/services/music"), "/volume2/music") << "the other plays on";
+    ASSERT_EQ(TAVOServiceActionSet(6, TAVO_SERVICE_KEY_NO), 0);
+    EXPECT_EQ(TAVOServiceRemovebyInfo(&audio, 0), 0);
+    EXPECT_EQ(LinkTarget("/var/services/music"), "");
+    EXPECT_EQ(TAVOServiceRemovebyInfo(nullptr, 0), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_removeby_info"}));
+}
+
+TEST_F(Services, UserHomesAreMadeForEverybodyAndLeftAlone)
+{
+    ASSERT_EQ(::mkdir("/volume2/homes", 0755), 0);
+    test::WriteFile("/volume2/homes/guest", "no folder");
+    ASSERT_EQ(TAVOServiceActionSet(11, TAVO_SERVICE_ENABLE), 0);
+    struct stat st;
+    ASSERT_EQ(::stat("/var/services/homes/admin", &st), 0);
+    EXPECT_EQ(st.st_mode & 07777, 0700u);
+    EXPECT_EQ(st.st_uid, ::getpwnam("admin")->pw_uid);
+    EXPECT_EQ(test::ReadFile("/volume2/homes/guest"), "no folder") << "whatever has the name stays";
+    test::WriteFile("/volume2/homes/admin/diary", "x");
+    ASSERT_EQ(TAVOServiceActionSet(11, TAVO_SERVICE_DISABLE), 0);
+    ASSERT_EQ(TAVOServiceActionSet(11, TAVO_SERVICE_ENABLE), 0);
+    EXPECT_EQ(test::ReadFile("/var/services/homes/admin/diary"), "x");
+}
+
+TEST_F(Services, TheLinksFolderIsMadeWhereItIsMissing)
+{
+    std::filesystem::remove_all("/var/services");
+    ::umask(022);
+    ASSERT_EQ(TAVOServiceLinkSet(1, "/volume1/web"), 0);
+    EXPECT_EQ(LinkTarget("/var/services/web"), "/volume1/web");
+    struct stat st;
+    ASSERT_EQ(::stat("/var/services", &st), 0);
+    EXPECT_EQ(st.st_mode & 07777, 0755u);
+
+    // What is no directory goes; a link to one is one.
+    std::filesystem::remove_all("/var/services");
+    test::WriteFile("/var/services", "a file");
+    ASSERT_EQ(TAVOServiceLinkSet(1, "/volume1/web"), 0);
+    std::filesystem::remove_all("/var/services");
+    ASSERT_EQ(::mkdir("/volume1/links", 0755), 0);
+    ASSERT_EQ(::symlink("/volume1/links", "/var/services"), 0);
+    ASSERT_EQ(TAVOServiceLinkSet(1, "/volume1/web"), 0);
+    EXPECT_EQ(LinkTarget("/volume1/links/web"), "/volume1/web");
+    std::filesystem::remove("/var/services");
+
+    log_.Clear();
+    ASSERT_EQ(::mount("tmpfs", "/var", "tmpfs", MS_RDONLY, nullptr), 0);
+    EXPECT_EQ(TAVOServiceLinkSet(1, "/volume1/web"), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_MKDIR_FAILED, "service_link_set"}));
+    ::umount2("/var", MNT_DETACH);
+    ASSERT_EQ(log_.Lines().size(), 1u);
+    EXPECT_THAT(log_.Lines()[0].text,
+                testing::MatchesRegex("service_link_set\\([0-9]+\\)Failed to mkdir : /var/services"));
+
+    ASSERT_EQ(::mount("tmpfs", "/var", "tmpfs", 0, "nr_inodes=1"), 0);
+    EXPECT_EQ(TAVOServiceLinkSet(1, "/volume1/web"), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_NOT_ENOUGH_SPACE, "service_link_set"}));
+    ::umount2("/var", MNT_DETACH);
+
+    for (const char *target : {"", static_cast<const char *>(nullptr)}) {
+        EXPECT_EQ(TAVOServiceLinkSet(1, target), -1);
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_link_set"}));
+    }
+    log_.Clear();
+    EXPECT_EQ(TAVOServiceLinkSet(12, "/volume1/web"), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_setting_get"}));
+    ASSERT_EQ(log_.Lines().size(), 1u);
+    EXPECT_THAT(log_.Lines()[0].text,
+                testing::MatchesRegex("service_link_set\\([0-9]+\\)\\[D00\\] Failed to get service info : id = 12"));
+}
+
+// A status asks the settings for a plain "no"; anything else, and no answer at all, is a yes.
+TEST(ServiceSTDStatus, CountsAsEnabledUnlessItSaysNo)
+{
+    const struct {
+        const char *value;
+        int on;
+    } cases[] = {{"yes", 1}, {"no", 0}, {"NO", 1}, {"maybe", 1}, {nullptr, 1}};
+    for (const auto &[value, on] : cases) {
+        if (value) {
+            ASSERT_EQ(TLIBFileSetKeyValue("/etc/tavoinfo.conf", "runfiledeck", value, nullptr), 1);
+        } else {
+            ASSERT_EQ(TLIBFileRemoveKey("/etc/tavoinfo.conf", "runfiledeck"), 1);
+        }
+        test::ForgetFault();
+        EXPECT_EQ(TAVOServiceStatusGet(18), on) << (value ? value : "not there");
+        EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    }
+    EXPECT_EQ(TAVOServiceSTDStatus(nullptr), 0);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_std_status"}));
+    EXPECT_EQ(TAVOServiceSTDStatus(TAVOServiceInfoGet(30)), 0);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_std_status"}));
+
+    // Under somebody else's lock nobody knows.
+    const pid_t holder = ::fork();
+    if (holder == 0) {
+        ErrTLIBFileCloseLock();
+        ErrTLIBFileLock(TAVO_LOCK_TAVOINFO | TAVO_LOCK_EXCLUSIVE, 0);
+        test::WriteFile("/tmp/held", "");
+        for (;;)
+            ::pause();
+    }
+    ASSERT_TRUE(test::Soon([] { return std::filesystem::exists("/tmp/held"); }));
+    EXPECT_EQ(TAVOServiceStatusGet(18), 0);
+    EXPECT_EQ(TLIBErrGet(), ERR_LOCK_FAILED);
+    ::kill(holder, SIGKILL);
+    ::waitpid(holder, nullptr, 0);
+    EXPECT_EQ(TAVOServiceStatusGet(18), 1);
+}
+
 TEST(ServiceVolumeGetbyLink, FollowsAndRefuses)
 {
     const test::ScratchDir dir;
@@ -420,6 +557,12 @@ TEST(ServiceVolumeGetbyLink, FollowsAndRefuses)
     EXPECT_EQ(follow(), 0);
     EXPECT_STREQ(volume, "/nowhere/web");
     EXPECT_STREQ(path, "/nowhere");
+
+    ::unlink(link.c_str());
+    ASSERT_EQ(::mkdir((dir / "folder").c_str(), 0755), 0);
+    ASSERT_EQ(::symlink("folder", link.c_str()), 0);
+    EXPECT_EQ(follow(), 1) << "from wherever it is asked for";
+    EXPECT_STREQ(volume, "folder");
 
     ::unlink(link.c_str());
     ASSERT_EQ(::symlink(("/" + std::string(60, 'x')).c_str(), link.c_str()), 0);
