@@ -47,6 +47,7 @@ typedef struct PARTTYPE {
     uint32_t fWindows;  /* 1 for a type that holds FAT or NTFS */
 } PARTTYPE;
 
+/* Every type that has a name; the last row ends the table. */
 extern TAVO_API const PARTTYPE PartType[49];
 
 /* The layout version of new disks when nothing else is known. */

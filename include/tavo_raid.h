@@ -208,6 +208,7 @@ TAVO_API int RAIDCreate(const RAIDREQUEST *pRequest);
 TAVO_API int RAIDAssemble(const char *szPath, const char *szUuid);
 TAVO_API int RAIDAssembleByInfo(const RAIDINFO *pInfo);
 
+/* Stops an array; its members keep their superblocks. */
 TAVO_API int RAIDStop(const char *szPath);
 
 /* Stops an array and erases the superblocks of its members. Also of a list; one that does not exist is passed over, and
