@@ -2,9 +2,10 @@
 // single session, so the key alone does not tell and the process is asked for, too.
 #include "tavo_service.h"
 
+#include "core/detail/guard.h"
 #include "service/detail/process_named.h"
 
 extern "C" int TAVOServiceFTPStatus(const TAVOSERVICE *pService)
 {
-    return TAVOServiceSTDStatus(pService) == 1 && tavo::IsProcessNamed("ftpd");
+    return TAVOServiceSTDStatus(pService) == 1 && Guard([] { return tavo::IsProcessNamed("ftpd"); });
 }

@@ -2,7 +2,7 @@
 // the first printer.
 #include "tavo_service.h"
 
-#include "core/detail/fault.h"
+#include "core/detail/guard.h"
 #include "service/detail/process_named.h"
 #include "service/detail/service_table.h"
 
@@ -10,5 +10,5 @@ extern "C" int TAVOServicePrinterStatus(const TAVOSERVICE *pService)
 {
     if (!pService || !pService->szName)
         return FailZero(ERR_BAD_PARAMETERS);
-    return TAVOServiceSTDStatus(pService) == 1 && tavo::IsProcessNamed("lpd");
+    return TAVOServiceSTDStatus(pService) == 1 && Guard([] { return tavo::IsProcessNamed("lpd"); });
 }

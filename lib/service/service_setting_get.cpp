@@ -1,6 +1,7 @@
 // Fills the record of a service's data folder: its name, its capability, and where its link leads.
 #include "tavo_service.h"
 
+#include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "service/detail/service_table.h"
 #include "service/detail/settings_files.h"
@@ -36,10 +37,11 @@ extern "C" int TAVOServiceSettingGet(int idShare, TAVOSERVICESHARE *pShare)
     share.fOnVolume = result == 1;
     if (share.szVolumePath[0]) {
         TLIBErrSet(ERR_SUCCESS);
-        const int type = tavo::VolumeType(share.szVolumePath);
-        if (type < 0)
-            LogError("%s:%d Failed to check volume type: path=[%s], tavoerr=0x%04X", share.szVolumePath,
-                     static_cast<int>(ERR_NO_VOLUME_ID));
+        const int type = Guard([&] { return tavo::VolumeType(share.szVolumePath); });
+        if (type < 0) {
+            const int code = TLIBErrGet() ? TLIBErrGet() : ERR_NO_VOLUME_ID;
+            LogError("%s:%d Failed to check volume type: path=[%s], tavoerr=0x%04X", share.szVolumePath, code);
+        }
         share.fSpecialVolume = IsSpecial(type);
     }
     *pShare = share;

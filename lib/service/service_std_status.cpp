@@ -5,7 +5,7 @@
 #include "tavo_lock.h"
 #include "tavo_proc.h"
 
-#include "core/detail/fault.h"
+#include "core/detail/guard.h"
 #include "core/detail/keep_fault.h"
 #include "service/detail/process_named.h"
 #include "service/detail/service_table.h"
@@ -46,23 +46,27 @@ bool IsRunning(const char *proc)
     return std::strchr(proc, '/') ? TLIBProcAliveByPidFile(proc) : tavo::IsProcessNamed(proc);
 }
 
+bool IsOn(const TAVOSERVICE &service)
+{
+    const auto shares = tavo::SharesOf(service);
+    if (!service.szKey && !service.szProc && shares.empty())
+        return false;
+    const Enabled enabled = IsEnabled(service.szKey);
+    if (enabled == Enabled::unknown)
+        return false;
+    bool bound = true;
+    for (const int32_t id : shares) {
+        TAVOSERVICESHARE share;
+        bound = TAVOServiceSettingGet(id, &share) != 0 && bound;
+    }
+    return bound && enabled == Enabled::yes && IsRunning(service.szProc);
+}
+
 }  // namespace
 
 extern "C" int TAVOServiceSTDStatus(const TAVOSERVICE *pService)
 {
     if (!pService || !pService->szName)
         return FailZero(ERR_BAD_PARAMETERS);
-    const auto shares = tavo::SharesOf(*pService);
-    if (!pService->szKey && !pService->szProc && shares.empty())
-        return 0;
-
-    const Enabled enabled = IsEnabled(pService->szKey);
-    if (enabled == Enabled::unknown)
-        return 0;
-    bool bound = true;
-    for (const int32_t id : shares) {
-        TAVOSERVICESHARE share;
-        bound = TAVOServiceSettingGet(id, &share) != 0 && bound;
-    }
-    return bound && enabled == Enabled::yes && IsRunning(pService->szProc);
+    return Guard([&] { return IsOn(*pService); });
 }

@@ -1,12 +1,11 @@
 // Follows the link of a service to its data folder.
 #include "tavo_service.h"
 
-#include "core/detail/guard.h"
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 
 #include <cerrno>
 #include <cstring>
-#include <string>
 #include <string_view>
 
 #include <sys/stat.h>
@@ -47,10 +46,10 @@ extern "C" int TAVOServiceVolumeGetbyLink(const char *szLink, char *szVolume, in
         return 0;
     // A target that fills the buffer was cut: it would name another folder.
     if (length < 0 || length == cbVolume) {
-        const std::string target(szVolume, length < 0 ? 0 : static_cast<size_t>(length));
+        const int why = length < 0 ? errno : ENAMETOOLONG;
+        szVolume[cbVolume - 1] = 0;
+        LogError("%s(%d)szLinkPath = %s ,link value = %s , errno=%s", szLink, szVolume, std::strerror(why));
         szVolume[0] = 0;
-        LogError("%s(%d)szLinkPath = %s ,link value = %s , errno=%s", szLink, target,
-                 length < 0 ? std::strerror(errno) : std::strerror(ENAMETOOLONG));
         return Fail(ERR_UNKNOWN);
     }
     const std::string_view path = VolumePath(szVolume);

@@ -25,7 +25,7 @@ bool IsShell(std::string_view name) noexcept
 
 }  // namespace
 
-bool CommandHasName(std::string_view command, std::string_view name) noexcept
+bool CommandHasName(std::string_view command, std::string_view name)
 {
     if (command.starts_with('[') && command.ends_with(']'))
         return command == name || command.substr(1, command.size() - 2) == name;

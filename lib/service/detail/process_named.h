@@ -11,7 +11,7 @@ namespace tavo {
 bool IsProcessNamed(std::string_view name);
 
 // The name in one line of the process table; exported here for the tests.
-bool CommandHasName(std::string_view command, std::string_view name) noexcept;
+bool CommandHasName(std::string_view command, std::string_view name);
 
 }  // namespace tavo
 
