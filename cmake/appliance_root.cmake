@@ -18,5 +18,5 @@ endif()
 function(tavo_discover_tests test)
     set_target_properties(${test} PROPERTIES CROSSCOMPILING_EMULATOR
         "${TAVO_ENTER};${TAVO_ENTER_OPTIONS};--")
-    gtest_discover_tests(${test} DISCOVERY_MODE PRE_TEST TEST_PREFIX "${test}." PROPERTIES TIMEOUT 300)
+    gtest_discover_tests(${test} DISCOVERY_MODE PRE_TEST NO_PRETTY_VALUES TEST_PREFIX "${test}." PROPERTIES TIMEOUT 300)
 endfunction()
