@@ -438,6 +438,65 @@ TEST_F(Services, SharedFoldersAreReleasedByTheLast)
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_removeby_info"}));
 }
 
+TEST_F(Services, TheRecordSaysWhatTheModelHasAndWhereTheFolderIs)
+{
+    const struct {
+        int id;
+        const char *key, *value;
+        int supported;
+    } cases[] = {
+        {1, "supportweb", "YES", 1},
+        {1, "supportweb", "no", 0},
+        {1, "supportweb", "yes, very much", 0},
+        {3, "netbkp", "yes", 1},  // no "support" in front of this one
+        {9, "supportsurveillance", "no", 0},
+    };
+    TAVOSERVICESHARE share;
+    for (const auto &row : cases) {
+        ASSERT_EQ(TLIBFileSetKeyValue("/etc.defaults/tavoinfo.conf", row.key, row.value, nullptr), 1);
+        ASSERT_EQ(TAVOServiceSettingGet(row.id, &share), 0);
+        EXPECT_EQ(share.fSupported, row.supported) << row.key << "=" << row.value;
+    }
+    // Any one of a folder's keys will do; some folders need none.
+    for (const char *key : {"supportmediaservice", "support_audio", "supportitunes"})
+        ASSERT_EQ(TLIBFileSetKeyValue("/etc.defaults/tavoinfo.conf", key, "no", nullptr), 1);
+    TAVOServiceSettingGet(6, &share);
+    EXPECT_EQ(share.fSupported, 0);
+    ASSERT_EQ(TLIBFileSetKeyValue("/etc.defaults/tavoinfo.conf", "supportitunes", "yes", nullptr), 1);
+    TAVOServiceSettingGet(6, &share);
+    EXPECT_EQ(share.fSupported, 1);
+    for (const int id : {8, 10, 11}) {
+        TAVOServiceSettingGet(id, &share);
+        EXPECT_EQ(share.fSupported, 1) << id;
+    }
+
+    // A link to no volume is told in the log and is no failure; one to a remote volume is special.
+    ASSERT_EQ(TAVOServiceLinkSet(1, "/nowhere/web"), 0);
+    log_.Clear();
+    TLIBErrSet(ERR_OPEN_FAILED);
+    EXPECT_EQ(TAVOServiceSettingGet(1, &share), 0);
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS) << "a link that leads anywhere clears the error";
+    ASSERT_EQ(log_.Lines().size(), 1u);
+    EXPECT_THAT(log_.Lines()[0].text,
+                testing::MatchesRegex("service_setting_get:[0-9]+ Failed to check volume type: path=\\[/nowhere\\], "
+                                      "tavoerr=0x6000"));
+    EXPECT_STREQ(share.szVolume, "/nowhere/web");
+    EXPECT_STREQ(share.szVolumePath, "/nowhere");
+    EXPECT_EQ(share.fOnVolume, 0);
+    ::umount2("/volume1", MNT_DETACH);
+    ASSERT_EQ(::mount("server:/export", "/volume1", "tmpfs", 0, nullptr), 0);
+    ASSERT_EQ(TAVOServiceSet(1, "/volume1"), 0);
+    EXPECT_EQ(TAVOServiceSettingGet(1, &share), 1);
+    EXPECT_EQ(share.fOnVolume, 1);
+    EXPECT_EQ(share.fSpecialVolume, 1);
+
+    for (const int id : {0, 12, -1}) {
+        EXPECT_EQ(TAVOServiceSettingGet(id, &share), -1);
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_setting_get"}));
+    }
+    EXPECT_EQ(TAVOServiceSettingGet(1, nullptr), -1);
+}
+
 TEST_F(Services, UserHomesAreMadeForEverybodyAndLeftAlone)
 {
     ASSERT_EQ(::mkdir("/volume2/homes", 0755), 0);
@@ -593,6 +652,17 @@ TEST(ServiceEnableGet, TakesYesInAnyCase)
     EXPECT_EQ(TAVOServiceEnableGet(0), 0);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_enable_get"}));
     EXPECT_EQ(TAVOServiceEnableGet(8), 0) << "the spooler has no key";
+
+    // The download scheduler keeps its own settings.
+    test::CapturedLog log;
+    ASSERT_EQ(TLIBFileSetKeyValue("/etc/tavoinfo.conf", "download_enabled", "yes", nullptr), 1);
+    EXPECT_EQ(TAVOServiceEnableGet(4), 0);
+    ASSERT_EQ(log.Lines().size(), 1u);
+    EXPECT_THAT(log.Lines()[0].text,
+                testing::MatchesRegex("service_enable_get\\([0-9]+\\)\\[900\\] Failed to get info of download deck"));
+    test::WriteFile("/usr/tavo/etc/download.conf", "download_enabled=Yes\n");
+    EXPECT_EQ(TAVOServiceEnableGet(4), 1);
+    std::filesystem::remove("/usr/tavo/etc/download.conf");
 }
 
 }  // namespace
