@@ -18,14 +18,16 @@ AddFamily AddLvm;
 AddFamily AddUser;
 AddFamily AddGroup;
 AddFamily AddQuota;
+AddFamily AddNet;
+AddFamily AddDiscover;
 AddFamily AddService;
 AddFamily AddError;
 AddFamily AddVersion;
 
 // In the order of the help text.
 inline constexpr AddFamily *families[] = {
-    AddConf, AddSection, AddLock,  AddProc,  AddDisk,    AddPartition, AddRaid,
-    AddLvm,  AddUser,    AddGroup, AddQuota, AddService, AddError,     AddVersion,
+    AddConf, AddSection, AddLock,  AddProc, AddDisk,     AddPartition, AddRaid,  AddLvm,
+    AddUser, AddGroup,   AddQuota, AddNet,  AddDiscover, AddService,   AddError, AddVersion,
 };
 
 }  // namespace tavoctl

@@ -1,0 +1,320 @@
+// tavoctl net and discover on cards of a kernel: what they show, refuse and change, and what they put back.
+#include "tools/tavoctl/run_tavoctl.h"
+
+#include "support/rounds.h"
+#include "support/scratch_dir.h"
+#include "support/virtual_cable.h"
+
+#include <gmock/gmock.h>
+
+#include <functional>
+#include <memory>
+#include <optional>
+#include <random>
+
+using test::Node;
+using test::Ran;
+using test::ReadFile;
+using test::RunningTavoctl;
+using test::Tavoctl;
+using test::VirtualCable;
+using test::WriteFile;
+using testing::AllOf;
+using testing::HasSubstr;
+
+namespace {
+
+constexpr const char *kIfcfg = "/etc/sysconfig/network-scripts/ifcfg-eth0";
+constexpr const char *kNetwork = "/etc/sysconfig/network";
+constexpr const char *kTrial = "/var/run/tavo-net-trial.pid";
+
+bool Eventually(const std::function<bool()> &condition)
+{
+    for (int i = 0; i < 6000; ++i) {
+        if (condition())
+            return true;
+        ::usleep(10000);
+    }
+    return false;
+}
+
+// As an administrator wrote them: with a comment, and not in the order of the library.
+constexpr const char *kOldFile = "# the rack\nIPADDR=192.0.2.10\nDEVICE=eth0\nNETMASK=255.255.255.0\nONBOOT=yes\n"
+                                 "BOOTPROTO=static\n";
+constexpr const char *kOldNetwork = "HOSTNAME=here\nGATEWAY=192.0.2.1\n";
+
+// What the kernel says of eth0 and the way out.
+std::string Live()
+{
+    const test::ScratchDir dir;
+    test::ShellStatus("ip -4 addr show dev eth0 | grep inet >" + (dir / "live") + "; ip route | grep default >>" +
+                      (dir / "live"));
+    return ReadFile(dir / "live");
+}
+
+class Net : public testing::Test {
+  protected:
+    void SetUp() override
+    {
+        if (const std::string missing = VirtualCable::Missing(); !missing.empty())
+            GTEST_SKIP() << missing;
+        if (test::RootLacks("foreign-exec"))
+            GTEST_SKIP() << "runs tavoctl";
+        cable_.emplace("cable");
+        there_.emplace("there");
+        cable_->Plug(*there_, "eth0");
+        ASSERT_EQ(there_->Shell("ifconfig eth0 192.0.2.99 netmask 255.255.255.0 up"), 0);
+        here_ = NewNode("here", 10);
+    }
+
+    std::unique_ptr<Node> NewNode(const std::string &name, int last)
+    {
+        auto node = std::make_unique<Node>(name);
+        cable_->Plug(*node, "eth0");
+        EXPECT_TRUE(node->Run([&] {
+            WriteFile(kIfcfg, kOldFile);
+            WriteFile(kNetwork, kOldNetwork);
+            EXPECT_EQ(test::ShellStatus("ifconfig eth0 192.0.2." + std::to_string(last) +
+                                        " netmask 255.255.255.0 up; route add default gw 192.0.2.1"),
+                      0);
+            return true;
+        }));
+        return node;
+    }
+
+    std::optional<VirtualCable> cable_;
+    std::optional<Node> there_;
+    std::unique_ptr<Node> here_;
+};
+
+TEST_F(Net, ShowsWhatWasSet)
+{
+    EXPECT_TRUE(here_->Run([] {
+        EXPECT_EQ(Tavoctl({"net", "set", "192.0.2.20/25", "--gateway", "192.0.2.99"}).status, 0);
+        EXPECT_EQ(Tavoctl({"net", "dns", "192.0.2.53", "2001:db8::53"}).status, 0);
+        EXPECT_EQ(Tavoctl({"net", "hostname", "attic"}).status, 0);
+        EXPECT_EQ(Tavoctl({"net", "mtu", "eth0", "1400"}).status, 0);
+        EXPECT_EQ(Tavoctl({"net", "ipv6", "eth0", "on"}).status, 0);
+        EXPECT_EQ(Tavoctl({"net", "ipv6", "eth0", "2001:db8::20/64", "--gateway", "2001:db8::1"}).status, 0);
+        const Ran shown = Tavoctl({"net", "show", "--json"});
+        EXPECT_EQ(shown.status, 0) << shown;
+        for (const char *fact :
+             {R"("hostname": "attic")", R"("interface": "eth0")", R"("mode": "static")", R"("address": "192.0.2.20")",
+              R"("mask": "255.255.255.128")", R"("broadcast": "192.0.2.127")", R"("gateway": "192.0.2.99")",
+              R"("live_gateway": "192.0.2.99")", R"("192.0.2.53")", R"("2001:db8::53")", R"("mtu": 1400)",
+              R"("link": true)", R"("ipv6": true)", R"("2001:db8::20/64")", R"("wake_on_lan": null)"})
+            EXPECT_THAT(shown.out, HasSubstr(fact));
+        EXPECT_EQ(Tavoctl({"net", "ipv6", "--remove", "eth0", "2001:db8::20/64", "--gateway", "2001:db8::1"}).status,
+                  0);
+        EXPECT_EQ(Tavoctl({"net", "ipv6", "eth0", "off"}).status, 0);
+        EXPECT_THAT(Tavoctl({"net", "show", "--json"}).out,
+                    AllOf(HasSubstr(R"("ipv6": false)"), HasSubstr(R"("ipv6_addresses": [])")));
+        EXPECT_THAT(Tavoctl({"net", "show"}).out, HasSubstr("192.0.2.20"));
+        return true;
+    }));
+}
+
+TEST_F(Net, RefusesWhatCannotBe)
+{
+    EXPECT_TRUE(here_->Run([] {
+        const std::string live = Live();
+        const struct {
+            test::Words words;
+            int status;
+            const char *says;
+        } rows[] = {
+            {{"net", "set", "192.0.2.300/24"}, 2, "no host can have that address"},
+            {{"net", "set", "192.0.2.20"}, 2, "an address and a mask"},
+            {{"net", "set", "192.0.2.20/33"}, 2, "1 to 32 bits"},
+            {{"net", "set", "192.0.2.20/255.0.255.0"}, 2, "that is no mask"},
+            {{"net", "set", "--interface", "eth0;reboot", "192.0.2.20/24"}, 2, "no interface of that name"},
+            {{"net", "set", "--interface", "../../shadow", "192.0.2.20/24"}, 2, "no interface of that name"},
+            {{"net", "set", "192.0.2.20/24", "--gateway", "router"}, 2, "no host can have that address"},
+            {{"net", "set", "--try", "0", "192.0.2.20/24"}, 2, "--try"},
+            {{"net", "gateway", "198.51.100.1"}, 1, "is it on the network of an interface?"},
+            {{"net", "gateway", "$(reboot)"}, 1, "ERR_INVALID_NETNAME"},
+            {{"net", "dns"}, 2, "none was named"},
+            {{"net", "dns", "192.0.2.53", "ns.example"}, 1, "ERR_INVALID_NETNAME"},
+            {{"net", "hostname", "0attic"}, 1, "ERR_INVALID_NETNAME"},
+            {{"net", "mtu", "eth0", "1400x"}, 2, "that is no number"},
+            {{"net", "mtu", "eth0", "67"}, 2, "ERR_BAD_PARAMETERS"},
+            {{"net", "ipv6", "eth0", "2001:db8::1/129"}, 1, "ERR_INVALID_NETNAME"},
+            {{"net", "ipv6", "eth0", "maybe"}, 2, "neither on nor off"},
+            {{"net", "wol", "eth0", "on"}, 1, "ERR_OP_FAILURE"},
+            {{"net", "bond", "--yes", "fast", "eth0"}, 2, "there is no mode fast"},
+            {{"net", "bond", "--yes", "backup"}, 2, "it has no members"},
+            {{"net", "bond", "--yes", "backup", "lo"}, 1, "it is no Ethernet card"},
+            {{"net", "bond", "backup", "eth0"}, 2, "nobody can be asked"},
+            {{"net", "confirm"}, 3, "none are on trial"},
+            {{"net", "check-address", "nonsense"}, 2, "ERR_BAD_PARAMETERS"},
+        };
+        for (const auto &row : rows) {
+            const Ran ran = Tavoctl(row.words);
+            EXPECT_EQ(ran.status, row.status) << ran;
+            EXPECT_THAT(ran.err, HasSubstr(row.says));
+        }
+        EXPECT_EQ(Live(), live);
+        EXPECT_EQ(ReadFile(kIfcfg), kOldFile);
+        EXPECT_EQ(ReadFile(kNetwork), kOldNetwork);
+        return true;
+    }));
+}
+
+TEST_F(Net, TellsWhetherAnAddressIsFree)
+{
+    EXPECT_TRUE(here_->Run([] {
+        const Ran used = Tavoctl({"net", "check-address", "192.0.2.99"});
+        EXPECT_EQ(used.status, 4);
+        EXPECT_EQ(used.out, "used\n");
+        const Ran own = Tavoctl({"net", "check-address", "--json", "192.0.2.10"});
+        EXPECT_EQ(own.status, 0);
+        EXPECT_THAT(own.out, HasSubstr(R"("used": false)"));
+        return true;
+    }));
+}
+
+bool IsAsBefore(const std::string &live)
+{
+    EXPECT_EQ(Live(), live);
+    EXPECT_EQ(ReadFile(kIfcfg), kOldFile);
+    EXPECT_EQ(ReadFile(kNetwork), kOldNetwork);
+    return !testing::Test::HasFailure();
+}
+
+bool TrialIsOver()
+{
+    return ::access(kTrial, F_OK) != 0;
+}
+
+TEST_F(Net, ATrialEndsWithoutAnAnswer)
+{
+    EXPECT_TRUE(here_->Run([] {
+        const std::string live = Live();
+        RunningTavoctl trial({"net", "set", "--try", "2", "192.0.2.20/24", "--gateway", "192.0.2.2"});
+        EXPECT_TRUE(Eventually([] { return Live().find("via 192.0.2.2 ") != std::string::npos; }));
+        const Ran second = Tavoctl({"net", "set", "--try", "9", "192.0.2.30/24"});
+        EXPECT_EQ(second.status, 4) << second;
+        const Ran ran = trial.Wait();
+        EXPECT_EQ(ran.status, 1);
+        EXPECT_THAT(ran.err, HasSubstr("the old ones are back"));
+        EXPECT_TRUE(TrialIsOver());
+        return IsAsBefore(live);
+    }));
+}
+
+TEST_F(Net, ATrialThatIsConfirmedStays)
+{
+    EXPECT_TRUE(here_->Run([] {
+        RunningTavoctl trial({"net", "set", "--try", "60", "192.0.2.20/24"});
+        EXPECT_TRUE(Eventually([] { return Live().find("192.0.2.20/24") != std::string::npos; }));
+        EXPECT_EQ(Tavoctl({"net", "confirm"}).status, 0);
+        EXPECT_EQ(trial.Wait().status, 0);
+        EXPECT_TRUE(TrialIsOver());
+        EXPECT_THAT(ReadFile(kIfcfg), HasSubstr("IPADDR=192.0.2.20\n"));
+        EXPECT_EQ(Tavoctl({"net", "confirm"}).status, 3) << "once";
+
+        // The administrator's line is cut off with his address; he comes back by the new one and confirms.
+        std::optional<RunningTavoctl> cut(std::in_place, test::Words{"net", "set", "--try", "60", "192.0.2.30/24"});
+        EXPECT_TRUE(Eventually([] { return Live().find("192.0.2.30/24") != std::string::npos; }));
+        ::usleep(500000);
+        ::kill(cut->Pid(), SIGKILL);
+        cut.reset();
+        EXPECT_EQ(Tavoctl({"net", "confirm"}).status, 0);
+        EXPECT_THAT(Live(), HasSubstr("192.0.2.30/24"));
+        EXPECT_TRUE(TrialIsOver());
+
+        const Ran kept = test::TavoctlAtTerminal({"net", "set", "--try", "60", "192.0.2.40/24"}, "y\n");
+        EXPECT_EQ(kept.status, 0) << kept;
+        EXPECT_THAT(Live(), HasSubstr("192.0.2.40/24"));
+        const Ran given_up = test::TavoctlAtTerminal({"net", "set", "--try", "60", "192.0.2.50/24"}, "n\n");
+        EXPECT_EQ(given_up.status, 1) << given_up;
+        EXPECT_THAT(Live(), HasSubstr("192.0.2.40/24"));
+        return true;
+    }));
+}
+
+TEST_F(Net, AChangeThatFailsIsNotTried)
+{
+    EXPECT_TRUE(here_->Run([] {
+        const std::string live = Live();
+        const Ran ran = Tavoctl({"net", "set", "--try", "60", "192.0.2.20/24", "--gateway", "198.51.100.1"});
+        EXPECT_EQ(ran.status, 1);
+        EXPECT_THAT(ran.err, HasSubstr("the old settings are back"));
+        EXPECT_TRUE(TrialIsOver());
+        return IsAsBefore(live);
+    }));
+}
+
+// The command dies at any moment: before the change, in the middle of it, and while it waits.
+TEST_F(Net, AKilledTrialPutsTheOldSettingsBack)
+{
+    constexpr int nodes = 4;
+    std::vector<std::unique_ptr<Node>> others;
+    for (int i = 0; i < nodes; ++i)
+        others.push_back(NewNode("node" + std::to_string(i), 10));
+    const int rounds = test::Rounds(104) / nodes + 1;
+    std::vector<pid_t> running;
+    for (int i = 0; i < nodes; ++i) {
+        const pid_t pid = ::fork();
+        if (pid != 0) {
+            running.push_back(pid);
+            continue;
+        }
+        const bool done = others[static_cast<size_t>(i)]->Run([&] {
+            std::mt19937 random(static_cast<unsigned>(i));
+            const std::string live = Live();
+            bool same = true;
+            for (int round = 0; round < rounds && same; ++round) {
+                std::optional<RunningTavoctl> trial(
+                    std::in_place, test::Words{"net", "set", "--try", "1", "192.0.2.20/25", "--gateway", "192.0.2.2"});
+                // Until it has begun, nothing is changed; from then on at any moment of the change and the wait.
+                Eventually([&] { return !TrialIsOver() && (round != 0 || Live() != live); });
+                ::usleep(static_cast<useconds_t>(random() % 600000));
+                ::kill(trial->Pid(), SIGKILL);
+                trial.reset();
+                same = Eventually(TrialIsOver) && IsAsBefore(live);
+                EXPECT_TRUE(same) << "round " << round;
+            }
+            return same;
+        });
+        std::fflush(nullptr);
+        ::_exit(done ? 0 : 1);
+    }
+    for (const pid_t pid : running) {
+        int status = 1;
+        ::waitpid(pid, &status, 0);
+        EXPECT_EQ(status, 0);
+    }
+    RecordProperty("kills", rounds * nodes);
+}
+
+TEST_F(Net, DiscoverListsWhoAnswers)
+{
+    if (test::RootLacks("uids"))
+        GTEST_SKIP() << "the daemon has nobody to become";
+    ASSERT_EQ(there_->Shell("/usr/tavo/bin/findhostd"), 0);
+    ASSERT_EQ(here_->Shell("/usr/tavo/bin/findhostd"), 0);
+    EXPECT_TRUE(here_->Run([] {
+        const Ran found = Tavoctl({"discover", "--json"});
+        EXPECT_EQ(found.status, 0) << found;
+        EXPECT_THAT(found.out, AllOf(HasSubstr(R"("name": "there")"), HasSubstr(R"("address": "192.0.2.99")")));
+        // In a pipe, watching says what has changed: once, as nothing does. Asked to end, it ends when it has looked.
+        RunningTavoctl watch({"discover", "--watch"});
+        ::usleep(500000);
+        ::kill(watch.Pid(), SIGTERM);
+        const Ran watched = watch.Wait();
+        EXPECT_EQ(watched.status, 0) << watched;
+        return true;
+    }));
+    VirtualCable second("second");
+    second.Plug(*here_, "eth1");
+    EXPECT_TRUE(here_->Run([] {
+        const Ran found = Tavoctl({"discover"});
+        EXPECT_EQ(found.status, 0) << found;
+        EXPECT_THAT(found.out, HasSubstr("192.0.2.99"));
+        EXPECT_THAT(found.err, HasSubstr("not asked from wired interface 2"));
+        return true;
+    }));
+}
+
+}  // namespace
