@@ -3,7 +3,7 @@
 # chapters/FAMILY.sh; a later one finds what the earlier ones made.
 # usage: story.sh [CHAPTER]...   (all of them when none is named)
 set -eu
-export PATH=/usr/sbin:/usr/bin:/sbin:/bin
+export PATH=/usr/sbin:/usr/bin:/sbin:/bin:/usr/tavo/bin
 
 here=${0%/*}
 all='conf section lock proc error disk partition raid lvm volume user group quota net discover service'

@@ -1,6 +1,10 @@
 if machine; then
     say 'Disks: which bays are taken, by what, and how it is'
     run tavoctl disk list
+    for bay in 1 2 3; do
+        appliance-event pull $bay
+        run appliance-event plug $bay --blank 4736
+    done
     run tavoctl disk info sda
     run tavoctl disk cache sda on
 else

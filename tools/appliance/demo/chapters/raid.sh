@@ -7,7 +7,8 @@ if machine; then
     run appliance-event pull 3
     echo x >/dev/md2
     run tavoctl raid list
-    run appliance-event plug 3 --blank
+    mdadm --quiet /dev/md2 --fail detached --remove detached
+    run appliance-event plug 3 --blank 4736
     tavoctl partition create --yes --system sdc
     tavoctl partition create --yes --data sdc
     run tavoctl raid add --yes md2 sdc3
