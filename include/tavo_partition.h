@@ -81,7 +81,7 @@ TAVO_API int TAVOPartitionLayoutIdxGet(int version, int fRaid);
  * searched or pVersion is NULL. */
 TAVO_API int PartitionLayoutGet(int *pVersion);
 
-/* Creates partitions. flags are PARTITION_SYSTEM, PARTITION_DATA, see there; pVersion may be NULL for the version that
+/* Creates partitions. flags are PARTITION_SYSTEM, PARTITION_DATA, see there (0: nothing is made); pVersion may be NULL for the version that
  * the system carries. What is on the disk is lost. Returns 0 or -1. */
 TAVO_API int PartitionCreate(const char *szDisk, int flags, const int *pVersion);
 

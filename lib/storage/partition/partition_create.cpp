@@ -43,7 +43,7 @@ int CreateSystem(const char *disk, const TAVOPARTLAYOUT &layout, bool raid)
 
 extern "C" int PartitionCreate(const char *szDisk, int flags, const int *pVersion)
 {
-    if (!szDisk || !tavo::IsDevicePath(szDisk) || (flags & (PARTITION_SYSTEM | PARTITION_DATA)) == 0) {
+    if (!szDisk || !tavo::IsDevicePath(szDisk)) {
         LogError("%s:%d Bad parameters");
         return -1;
     }
@@ -60,6 +60,8 @@ extern "C" int PartitionCreate(const char *szDisk, int flags, const int *pVersio
             return -1;
         }
         const TAVOPARTLAYOUT &layout = grgAllTavoPartLayout[index];
-        return (flags & PARTITION_DATA) != 0 ? CreateData(szDisk, layout, raid) : CreateSystem(szDisk, layout, raid);
+        if ((flags & PARTITION_DATA) != 0)
+            return CreateData(szDisk, layout, raid);
+        return (flags & PARTITION_SYSTEM) != 0 ? CreateSystem(szDisk, layout, raid) : 0;
     });
 }

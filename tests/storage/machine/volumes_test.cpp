@@ -52,7 +52,8 @@ TEST_F(MachineVolumes, AreMadeRenamedExpandedAndRemoved)
     EXPECT_STREQ(volume, "/dev/vg1/lv");
     // All of it is used, and it can be written.
     EXPECT_EQ(Told("vgs --noheading -o vg_free_count vg1 | tr -d ' '"), "0\n");
-    Told("mkfs.ext4 -q /dev/vg1/lv && mount /dev/vg1/lv /mnt && cp /bin/busybox /mnt && md5sum /mnt/busybox >/tmp/sum && umount /mnt");
+    Told("mkfs.ext4 -q /dev/vg1/lv && mount /dev/vg1/lv /mnt && cp /bin/busybox /mnt && md5sum /mnt/busybox >/tmp/sum "
+         "&& umount /mnt");
 
     ASSERT_EQ(LVMVgRename("/dev/vg1", nullptr, "vg2"), 0);
     EXPECT_EQ(LVMVgSBGet("/dev/vg1", &group), 0);
@@ -84,7 +85,6 @@ TEST_F(MachineVolumes, AreMadeRenamedExpandedAndRemoved)
     EXPECT_EQ(LVMPvRemove("/dev/md2"), 0);
     EXPECT_EQ(LVMPvRemove("/dev/md3"), 0);
     EXPECT_THAT(PhysicalVolumes(), ElementsAre());
-
 }
 
 TEST_F(MachineVolumes, ADevicesVolumeGoesWithItsMountedSnapshots)
