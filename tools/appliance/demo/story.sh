@@ -34,9 +34,15 @@ if [ $# = 0 ]; then
     # shellcheck disable=SC2086
     set -- $all
 fi
+# Without namespaces there is no /proc, and what is asked there cannot be shown.
+need_proc=' proc disk partition raid lvm volume quota net discover service '
+left_out=
 for chapter; do
     # A chapter that is not written yet is no chapter.
-    if [ -f "$here/chapters/$chapter.sh" ]; then
-        . "$here/chapters/$chapter.sh"
-    fi
+    [ -f "$here/chapters/$chapter.sh" ] || continue
+    case $need_proc in
+    *" $chapter "*) [ -e /proc/self ] || { left_out="$left_out $chapter" && continue; } ;;
+    esac
+    . "$here/chapters/$chapter.sh"
 done
+[ ! "$left_out" ] || say "Left out, because there is no /proc in this form of the root:$left_out"
