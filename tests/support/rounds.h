@@ -3,13 +3,29 @@
 #define TESTS_SUPPORT_ROUNDS_H
 
 #include <cstdlib>
+#include <string_view>
 
 namespace test {
+
+// The virtual appliance, whose processor is emulated, has time for a part only.
+inline bool Emulated()
+{
+    const char *form = std::getenv("TAVO_ROOT_FORM");
+    return form && std::string_view(form) == "machine";
+}
 
 // All of them when TAVO_LONG_TESTS is in the environment; else an eighth, so that a run of everything stays short.
 inline int Rounds(int all)
 {
-    return std::getenv("TAVO_LONG_TESTS") ? all : all / 8;
+    if (std::getenv("TAVO_LONG_TESTS"))
+        return all;
+    return all / (Emulated() ? 32 : 8);
+}
+
+// From one of many moments to the next that is tried, such as the system calls at which something dies.
+inline int Stride()
+{
+    return Emulated() && !std::getenv("TAVO_LONG_TESTS") ? 11 : 1;
 }
 
 }  // namespace test

@@ -122,7 +122,7 @@ TEST(UserDeath, AtEverySystemCall)
         ASSERT_NE(before, after);
         int calls = 0;
         int kept = 0;
-        for (int n = 1;; ++n) {
+        for (int n = 1;; n += test::Stride()) {
             RestoreFiles(before);
             ASSERT_TRUE(GetUser("alice"));
             if (!DiesAtCall(n, work))
@@ -136,8 +136,8 @@ TEST(UserDeath, AtEverySystemCall)
             ASSERT_EQ(GetUser("robert") != nullptr, !test::LineOf("/etc/passwd", "robert").empty());
             CheckFiles(alice ? std::set<std::string>{"alice"} : std::set<std::string>{});
         }
-        EXPECT_GT(calls, 150);
-        EXPECT_GT(kept, 10) << "deaths behind the point of no return";
+        EXPECT_GT(calls, 150 / test::Stride());
+        EXPECT_GT(kept, 10 / test::Stride()) << "deaths behind the point of no return";
     }
 }
 

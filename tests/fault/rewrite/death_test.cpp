@@ -1,5 +1,6 @@
 // A process that dies in the middle of a rewrite: the file is the old one or the new one.
 #include "interposed_calls.h"
+#include "support/rounds.h"
 #include "support/scratch_dir.h"
 #include "writers.h"
 
@@ -103,7 +104,7 @@ TEST(Death, AtRandomMomentsLeavesOneOfTheTwoFiles)
     other_text.replace(other_text.find("key=new"), 7, "key=" + std::string(300, 'x'));
     std::mt19937 random(4711);  // the moments differ anyway
     int seen_old = 0, seen_other = 0;
-    for (int kill = 0; kill < 2000; ++kill) {
+    for (int kill = 0; kill < 2000 / test::Stride(); ++kill) {
         const pid_t child = ::fork();
         if (child == 0) {
             for (const std::string value(300, 'x');;) {
@@ -111,7 +112,7 @@ TEST(Death, AtRandomMomentsLeavesOneOfTheTwoFiles)
                 TLIBFileSetKeyValue(file.c_str(), "key", "new", nullptr);
             }
         }
-        ::usleep(std::uniform_int_distribution<unsigned>(0, 2000)(random));
+        ::usleep(useconds_t(std::uniform_int_distribution<int>(0, 2000 * test::Stride())(random)));
         ::kill(child, SIGKILL);
         StatusOf(child);
         const std::string text = test::ReadFile(file);
@@ -120,7 +121,7 @@ TEST(Death, AtRandomMomentsLeavesOneOfTheTwoFiles)
     }
     EXPECT_GT(seen_old, 0);
     EXPECT_GT(seen_other, 0);
-    EXPECT_GT(dir.Names().size(), 50u) << "too few were killed in the middle of it";
+    EXPECT_GT(dir.Names().size(), 50u / unsigned(test::Stride())) << "too few were killed in the middle of it";
     EXPECT_THAT(dir.Names(), testing::Each(testing::MatchesRegex("file(\\.[A-Za-z0-9]{6})?")));
 }
 
