@@ -3,8 +3,8 @@ mkdir -p /volume1
 if machine; then
     volume=$(lvs --noheadings -o lv_path 2>/dev/null | head -1 | tr -d ' ')
     : "${volume:=$(ls /dev/md[2-9] 2>/dev/null | head -1)}"
-    run mkfs.ext4 -q -O quota "$volume"
-    volume_back() { run mount -o usrquota "$volume" /volume1; }
+    run mkfs.ext4 -q "$volume"
+    volume_back() { run mount "$volume" /volume1; }
 else
     # Memory stands in for the array; it keeps what is on it while the volume is away.
     mkdir -p /tmp/array
