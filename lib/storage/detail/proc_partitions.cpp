@@ -12,14 +12,22 @@ namespace {
 constexpr unsigned kIdeMajors[] = {3, 22, 33, 34, 56, 57, 88, 89, 90, 91};
 constexpr unsigned kLargestMinor = 255;  // a device number has eight bits for it
 
+constexpr bool IsBlank(char c)
+{
+    return c == ' ' || c == '\t' || c == '\r' || c == '\n';
+}
+
 std::string_view TakeField(std::string_view &line)
 {
-    constexpr std::string_view blanks = " \t\r\n";
-    const size_t begin = std::min(line.find_first_not_of(blanks), line.size());
-    line.remove_prefix(begin);
-    const std::string_view field = line.substr(0, line.find_first_of(blanks));
-    line.remove_prefix(field.size());
-    return field;
+    const char *begin = line.data();
+    const char *const end = begin + line.size();
+    while (begin != end && IsBlank(*begin))
+        ++begin;
+    const char *stop = begin;
+    while (stop != end && !IsBlank(*stop))
+        ++stop;
+    line = {stop, static_cast<size_t>(end - stop)};
+    return {begin, static_cast<size_t>(stop - begin)};
 }
 
 template <class Number>

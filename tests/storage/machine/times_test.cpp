@@ -51,10 +51,10 @@ TEST_F(MachineTimes, TheListOfPartitionsCostsItsReading)
         std::free(numbers);
     };
     enumerate();
-    const double library = LeastMicroseconds(300, enumerate);
-    const double raw = LeastMicroseconds(300, read_it);
-    // 0.77 is the aim, on a machine that does nothing else.
-    EXPECT_GT(Tell("TAVODiskEnum", library, "reading alone", raw), 0.5);
+    const double library = LeastMicroseconds(1000, enumerate);
+    const double raw = LeastMicroseconds(1000, read_it);
+    // It is less than 1.3 times as much; the rest is for a machine that never comes to rest.
+    EXPECT_GT(Tell("TAVODiskEnum", library, "reading alone", raw), 1 / 1.5);
     Told("losetup -D");
 }
 
