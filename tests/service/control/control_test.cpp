@@ -353,6 +353,69 @@ TEST_F(Services, DataFoldersAreBoundInOrderAndNamedByTheirRule)
     EXPECT_EQ(LinkTarget("/var/services/photo"), "/volume2/photo");
 }
 
+// A server finds its folders when it starts.
+TEST_F(Services, FoldersAreBoundInOrderBeforeTheServerStarts)
+{
+    test::WriteFile("/var/standin/S86tavodms.sh.hook",
+                    "#!/bin/sh\ngrep '^\\[' /usr/tavo/etc/share.conf >/tmp/bound\n"
+                    "for link in music video photo; do readlink /var/services/$link >>/tmp/bound; done\n",
+                    0755);
+    ASSERT_EQ(TAVOServiceActionSet(4, TAVO_SERVICE_ENABLE), 0);
+    EXPECT_EQ(test::ReadFile("/tmp/bound"),
+              "[music]\n[video]\n[photo]\n/volume2/music\n/volume2/video\n/volume2/photo\n");
+}
+
+// What fails is told in one line, and nothing after it is done.
+TEST_F(Services, EachStepOfAnActionThatFailsIsTold)
+{
+    const auto expect = [&](int code, const char *text) {
+        EXPECT_EQ(TLIBErrGet(), code) << text;
+        std::vector<std::string> lines;
+        for (const auto &line : log_.Lines())
+            lines.push_back(line.text);
+        EXPECT_THAT(lines, testing::Contains(testing::MatchesRegex("service_std_action:[0-9]+ " + std::string(text))));
+        log_.Clear();
+    };
+
+    test::WriteFile("/volume2/web", "no folder");
+    EXPECT_EQ(TAVOServiceActionSet(0, TAVO_SERVICE_ENABLE), -1);
+    expect(ERR_MKDIR_FAILED, "Failed to set service web's share: volume = /volume2");
+    EXPECT_EQ(Setting("runweb"), "no");
+    std::filesystem::remove("/volume2/web");
+
+    // The daemon fails when the key is written already.
+    test::WriteFile("/var/standin/S97apache-user.sh.status", "3\n");
+    EXPECT_EQ(TAVOServiceActionSet(0, TAVO_SERVICE_ENABLE), -1);
+    expect(ERR_SERVICE_STD_ACTION, "TAVONetService failed with id=64");
+    EXPECT_EQ(Setting("runweb"), "yes");
+    std::filesystem::remove("/var/standin/S97apache-user.sh.status");
+
+    test::WriteFile("/var/standin/S95sshd.sh.hook", "#!/bin/sh\nkill -9 $PPID\n", 0755);
+    EXPECT_EQ(TAVOServiceActionSet(14, TAVO_SERVICE_START), -1);
+    expect(ERR_SERVICE_STD_ACTION, "TLIBExec failed with script=/usr/tavo/etc/rc.d/S95sshd.sh");
+    test::WriteFile("/var/standin/S95sshd.sh.status", "3\n");
+    std::filesystem::remove("/var/standin/S95sshd.sh.hook");
+    EXPECT_EQ(TAVOServiceActionSet(14, TAVO_SERVICE_START), 0) << "a script of its own may fail";
+
+    std::filesystem::remove("/var/services/web");
+    ASSERT_EQ(::mkdir("/var/services/web", 0755), 0);
+    EXPECT_EQ(TAVOServiceActionSet(0, TAVO_SERVICE_DISABLE), -1);
+    expect(ERR_SERVICE_REMOVE, "Failed to remove share of service web");
+    EXPECT_EQ(Setting("runweb"), "no") << "it is disabled all the same";
+
+    std::filesystem::rename("/etc/tavoinfo.conf", "/etc/tavoinfo.conf.away");
+    ASSERT_EQ(::mkdir("/etc/tavoinfo.conf", 0755), 0);
+    ScriptCalls();
+    EXPECT_EQ(TAVOServiceActionSet(17, TAVO_SERVICE_DISABLE), -1);
+    expect(TLIBErrGet(), "TAVOINFOSetKeyValue failed with key=runsamba");
+    EXPECT_THAT(ScriptCalls(), IsEmpty());
+    std::filesystem::remove("/etc/tavoinfo.conf");
+    std::filesystem::rename("/etc/tavoinfo.conf.away", "/etc/tavoinfo.conf");
+
+    EXPECT_EQ(TAVOServiceSTDAction(nullptr, TAVO_SERVICE_START), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_std_action"}));
+}
+
 TEST_F(Services, TheOldVolumeIsKeptAndAFullDeskHasNone)
 {
     char volume[52];
