@@ -14,8 +14,9 @@
  *
  * Rewriting is safe: the new text goes to a temporary file beside the target (its name and six random characters
  * after a dot), is synced to disk, gets the owner, group, permission bits and extended attributes of the old file, and
- * is renamed over it. A crash leaves the old file or the new one. A symbolic link is followed and stays a link; a hard
- * link is cut. After a failure the old file is as it was and the temporary file is gone. The codes of a rewrite are
+ * is renamed over it. A crash leaves the old file or the new one. A symbolic link is followed and stays a link, except in
+ * a directory that everybody may write to (/tmp), where writers refuse it with ERR_OPEN_FAILED; a hard link is cut. After
+ * a failure the old file is as it was and the temporary file is gone. The codes of a rewrite are
  *   ERR_OPEN_FAILED     the file cannot be opened or is no regular file, or the temporary file cannot be created
  *   ERR_STAT_FAILED     the state of the open file cannot be read
  *   ERR_WRITE_FAILED    reading the old text or writing the new one failed (a full disk)
@@ -90,10 +91,14 @@ TAVO_API int TLIBFileSetKeys(const char *szPath, const TLIBSZHASH *pshPairs, con
  */
 
 /* Copies a line, with a NUL, to szBuf of cbBuf bytes. A NULL szBuf with cbBuf 0 asks for the length only. The ByKey
- * form takes the first line that sets szKey. Both return the length with the NUL, 0 with ERR_KEY_NOT_FOUND      no such
- * line or -1 with szBuf untouched and ERR_BAD_PARAMETERS     szPath or szKey is NULL, lineNo is below 1, or szBuf is
- * NULL and cbBuf is not 0 ERR_OPEN_FAILED        the file cannot be opened or is no regular file ERR_NOT_ENOUGH_MEMORY
- * the line needs more than cbBuf bytes ERR_READ_FAILED, ERR_OUT_OF_MEMORY */
+ * form takes the first line that sets szKey.
+ * Both return the length with the NUL, 0 with
+ *   ERR_KEY_NOT_FOUND      no such line
+ * or -1 with szBuf untouched and
+ *   ERR_BAD_PARAMETERS     szPath or szKey is NULL, lineNo is below 1, or szBuf is NULL and cbBuf is not 0
+ *   ERR_OPEN_FAILED        the file cannot be opened or is no regular file
+ *   ERR_NOT_ENOUGH_MEMORY  the line needs more than cbBuf bytes
+ *   ERR_READ_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileGetLine(const char *szPath, int lineNo, char *szBuf, int cbBuf);
 TAVO_API int TLIBFileGetLineByKey(const char *szPath, const char *szKey, char *szBuf, int cbBuf);
 
@@ -131,9 +136,10 @@ TAVO_API int TLIBFileComment(const char *szPath, const char *szKey);
 TAVO_API int TLIBFileReplaceSubStr(const char *szPath, const char *szOld, const char *szNew);
 
 /* Creates a file of mode 0600 whose name is szTemplate with its last six characters, which must be "XXXXXX", made
- * unique; the name is written to szTemplate. Returns a stream for writing that the caller closes (close-on-exec), or
- * NULL with ERR_BAD_PARAMETERS  szTemplate is NULL ERR_OPEN_FAILED     the file or the stream cannot be created; no
- * file is left */
+ * unique; the name is written to szTemplate.
+ * Returns a stream for writing that the caller closes (close-on-exec), or NULL with
+ *   ERR_BAD_PARAMETERS  szTemplate is NULL
+ *   ERR_OPEN_FAILED     the file or the stream cannot be created; no file is left */
 TAVO_API FILE *TLIBFileTempFileOpen(char *szTemplate);
 
 /* Writes szPrefix and "PID-COUNT" to szBuf of cbBuf bytes; COUNT begins at 0 in a process and rises by one a call. It

@@ -55,14 +55,14 @@ TAVO_API int TLIBTimedExec(int cSeconds, const char *szProgram, ...);
 
 /*
  * Pid files: the first line holds a process id in decimal. A number outside 1 to the kernel's largest process id, or
- * with anything but blanks around it, is no number. For root, a pid file is no symbolic link, and it belongs to root or
- * to the user whose process it names; another one holds no number either: it may have been put there to have root
- * signal a process of somebody's choice.
+ * with anything but blanks around it, is no number. Root opens no symbolic link as a pid file, and for root a file that
+ * belongs neither to root nor to the user whose process it names holds no number either: both may have been put there to
+ * have root signal a process of somebody's choice.
  */
 
 /* Returns the process id in the pid file szPath; 0 when it holds no number; -1 with
  *   ERR_BAD_PARAMETERS  szPath is NULL
- *   ERR_OPEN_FAILED     the file cannot be opened, or is no regular file */
+ *   ERR_OPEN_FAILED     the file cannot be opened, is no regular file, or is a symbolic link and the caller root */
 TAVO_API pid_t TLIBReadPidFile(const char *szPath);
 
 /* Writes the caller's process id and a newline to szPath, creating the file with mode 0666 less the umask.

@@ -23,9 +23,11 @@ TAVO_BEGIN_DECLS
 
 /* Sets every pair of the first section szSection into the caller's hash *ppshHash, which may move; of a repeated key
  * the last line counts. A section that is not there is no error. Beware that reading ends at any line that begins with
- * "[", while rewriting only takes real headers for the end of a section. Returns the number of pairs in the hash, or -1
- * (the hash may hold a part of the pairs) with ERR_BAD_PARAMETERS  an argument or *ppshHash is NULL ERR_OPEN_FAILED the
- * file cannot be opened or is no regular file ERR_READ_FAILED, ERR_OUT_OF_MEMORY */
+ * "[", while rewriting only takes real headers for the end of a section.
+ * Returns the number of pairs in the hash, or -1 (the hash may hold a part of the pairs) with
+ *   ERR_BAD_PARAMETERS  an argument or *ppshHash is NULL
+ *   ERR_OPEN_FAILED     the file cannot be opened or is no regular file
+ *   ERR_READ_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileGetSection(const char *szPath, const char *szSection, TLIBSZHASH **ppshHash);
 
 /* Rewrites every section szSection. With flags 1 its header and body are replaced by the header of szNewName (NULL: the

@@ -22,7 +22,7 @@ TAVO_API char *TLIBStrSep(char **ppCursor, const char *szDelimiters);
 
 /* Copies szSrc to szDst without the white space at both ends (tab, line feed, carriage return, space), and then without
  * one pair of enclosing double quotes. szDst NULL or szSrc itself: in place; else it has room for the result.
- * Returns the length of the result without its NUL. -1 with
+ * Returns the length of the result in bytes, without its NUL. -1 with
  *   ERR_BAD_PARAMETERS  szSrc is NULL, or szDst overlaps it elsewhere than at its beginning; nothing was written */
 TAVO_API int TLIBStrTrimSpace(char *szSrc, char *szDst);
 
@@ -33,7 +33,7 @@ TAVO_API int TLIBStrTrimSpace(char *szSrc, char *szDst);
  * colon mostly looks as it was typed. Decoding what was encoded gives the same bytes, for every string; text that was
  * never encoded decodes too, and only these four sequences change.
  *
- * Both return the length of the result with its NUL, or -1 with
+ * Both return the length of the result in bytes, with its NUL, or -1 with
  *   ERR_BAD_PARAMETERS     szSrc is NULL, cbDst is negative, szDst is NULL while cbDst is not 0, or they overlap
  *   ERR_NOT_ENOUGH_MEMORY  szDst is too small; nothing was written
  * szDst NULL with cbDst 0 asks for that length. Decoding may be done in place (szDst is szSrc).
@@ -42,10 +42,12 @@ TAVO_API int TLIBStrEncodeColon(const char *szSrc, char *szDst, int cbDst);
 TAVO_API int TLIBStrDecodeColon(const char *szSrc, char *szDst, int cbDst);
 
 /* Copies the UTF-8 text szSrc in upper case, by the rules of no particular language, to szDst of cbDst bytes. The
- * result can be longer than the source. szDst may be szSrc. Returns the length of the result with its NUL; szDst NULL
- * with cbDst 0 asks for it. -1, and nothing written, with ERR_BAD_PARAMETERS     szSrc is NULL or is not UTF-8, cbDst
- * is negative, or szDst is NULL while cbDst is not 0 ERR_NOT_ENOUGH_MEMORY  szDst is too small ERR_OUT_OF_MEMORY no
- * memory for a long text */
+ * result can be longer than the source. szDst may be szSrc; szDst NULL with cbDst 0 asks for the length.
+ * Returns the length of the result with its NUL, or -1, with nothing written and
+ *   ERR_BAD_PARAMETERS     szSrc is NULL, is not UTF-8 or is longer than 512 MiB, cbDst is negative, or szDst is NULL
+ *                          while cbDst is not 0
+ *   ERR_NOT_ENOUGH_MEMORY  szDst is too small
+ *   ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBUnicodeUTF8StrUpper(const char *szSrc, char *szDst, int cbDst);
 
 /* The number of characters (code points) of the UTF-8 text sz. -1 with ERR_BAD_PARAMETERS: sz is NULL or is not UTF-8.

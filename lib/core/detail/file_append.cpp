@@ -18,6 +18,11 @@ void CutBack(int fd, off_t old_size, size_t appended)
 
 }  // namespace
 
+Fd OpenToAppend(const char *path)
+{
+    return OpenRegular(path, O_RDWR | O_APPEND | (IsInPublicDirectory(path) ? O_NOFOLLOW : 0));
+}
+
 bool AppendText(int fd, std::string text)
 {
     struct stat old;

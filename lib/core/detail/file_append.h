@@ -2,9 +2,15 @@
 #ifndef TAVO_CORE_DETAIL_FILE_APPEND_H
 #define TAVO_CORE_DETAIL_FILE_APPEND_H
 
+#include "core/detail/owner.h"
+
 #include <string>
 
 namespace tavo {
+
+// Opens a regular file for reading and appending; empty with errno on failure. A symbolic link is followed, except in a
+// directory that everybody may write to.
+Fd OpenToAppend(const char *path);
 
 // Appends text in one write and syncs it; `fd` is open for reading and appending. A last line that lacks its newline,
 // as a crash may leave it, gets it first. When it fails, the file is cut back to its old length.

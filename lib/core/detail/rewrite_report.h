@@ -12,13 +12,19 @@
 namespace tavo {
 namespace {
 
+// The file is the new one already, so that its directory could not be synced fails nothing.
+[[maybe_unused]] void LogUnsyncedDirectory(const FileRewrite &rewrite, Line line = Line{__builtin_LINE()})
+{
+    if (!rewrite.IsDirectorySynced())
+        LogError({"%s:%d Failed to sync the directory of %s, errno=%d", line.number}, rewrite.Target(), errno);
+}
+
 // 0, or -1 with the code set.
 [[maybe_unused]] int ReplaceOrFail(FileRewrite &rewrite, std::string_view text, Line line = Line{__builtin_LINE()})
 {
     if (const int code = rewrite.Replace(text))
         return Fail(code, line);
-    if (!rewrite.IsDirectorySynced())
-        LogError({"%s:%d Failed to sync the directory of %s, errno=%d", line.number}, rewrite.Target(), errno);
+    LogUnsyncedDirectory(rewrite, line);
     return 0;
 }
 

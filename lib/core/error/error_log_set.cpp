@@ -29,10 +29,11 @@ extern "C" int TLIBErrLogSet(const char *szPath, const char *szMessage)
     if (!szPath || !szMessage)
         return Fail(ERR_BAD_PARAMETERS, Line{33});
     return Guard([&] {
+        const std::string line = LogLine(szMessage);
         tavo::Fd fd = tavo::OpenLogFile(szPath, O_RDWR | O_CREAT | O_APPEND);
         if (!fd)
             return Fail(ERR_OPEN_FAILED, Line{38});
-        if (!tavo::WriteAll(fd.Get(), LogLine(szMessage)))
+        if (!tavo::WriteAll(fd.Get(), line))
             return Fail(ERR_WRITE_FAILED, Line{52});
         if (!tavo::SyncFd(fd.Get()) || !fd.Close())
             return Fail(ERR_WRITE_FAILED);

@@ -19,7 +19,10 @@ int CreateWith(const char *path, const std::string &line)
     const int code = rewrite.Replace(line);
     if (code == ERR_WRITE_FAILED)
         return Fail(code, Line{66});
-    return code ? Fail(code) : 1;
+    if (code)
+        return Fail(code);
+    tavo::LogUnsyncedDirectory(rewrite);
+    return 1;
 }
 
 int AppendUnlessSet(int fd, const char *key, const std::string &line)
@@ -45,7 +48,7 @@ extern "C" int TLIBFileAppendKey(const char *szPath, const char *szKey, const ch
         const std::optional<std::string> line = tavo::FormatLine(szFormat, szKey, szValue);
         if (!line)
             return Fail(ERR_BAD_PARAMETERS);
-        const tavo::Fd fd = tavo::OpenRegular(szPath, O_RDWR | O_APPEND);
+        const tavo::Fd fd = tavo::OpenToAppend(szPath);
         if (!fd && errno == ENOENT)
             return CreateWith(szPath, *line);
         if (!fd)

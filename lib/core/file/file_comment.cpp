@@ -64,11 +64,12 @@ bool OnSameFileSystem(int fd, const std::string &path)
 // False when the scratch file cannot serve; then the file is rewritten as every other one.
 bool ReplaceByScratch(tavo::FileRewrite &rewrite, std::string_view text)
 {
+    std::string path = kScratch;            // before the file: what is made must find its owner
     const tavo::Fd lock = CreateScratch();  // held beyond the rename
     if (!lock)
         return false;
     tavo::TempFile temp;
-    temp.Adopt(tavo::Fd(::fcntl(lock.Get(), F_DUPFD_CLOEXEC, 0)), kScratch);
+    temp.Adopt(tavo::Fd(::fcntl(lock.Get(), F_DUPFD_CLOEXEC, 0)), std::move(path));
     return OnSameFileSystem(lock.Get(), rewrite.Target()) && rewrite.ReplaceBy(temp, text) == 0;
 }
 
@@ -88,8 +89,10 @@ extern "C" int TLIBFileComment(const char *szPath, const char *szKey)
         const std::optional<std::string> changed = WithComments(text, szKey);
         if (!changed)
             return static_cast<int>(FailZero(ERR_KEY_NOT_FOUND));
-        if (ReplaceByScratch(rewrite, *changed))
+        if (ReplaceByScratch(rewrite, *changed)) {
+            tavo::LogUnsyncedDirectory(rewrite);
             return 1;
+        }
         return tavo::ReplaceOrFail(rewrite, *changed) == 0 ? 1 : -1;
     });
 }

@@ -14,7 +14,7 @@ extern "C" int ErrTLIBFileAddSection(const char *szPath, const char *szSection, 
         const std::optional<std::string> text = tavo::SectionText(szSection, pshPairs, szFormat);
         if (!text)
             return Fail(tavoerrno);
-        const tavo::Fd fd = tavo::OpenRegular(szPath, O_RDWR | O_APPEND);
+        const tavo::Fd fd = tavo::OpenToAppend(szPath);
         if (fd)
             return tavo::AppendText(fd.Get(), *text) ? 0 : Fail(ERR_WRITE_FAILED);
         tavo::FileRewrite rewrite;

@@ -3,6 +3,9 @@
 #include "support/captured_log.h"
 #include "support/fault_state.h"
 #include "support/scratch_dir.h"
+#include "tavo_error.h"
+#include "tavo_lock.h"
+#include "tavo_proc.h"
 #include "writers.h"
 
 #include <gmock/gmock.h>
@@ -88,6 +91,28 @@ TEST(FailingCalls, OfTheDirectoryAreOnlyLogged)
         EXPECT_THAT(log.Texts(),
                     ElementsAre(testing::MatchesRegex(writer.module + std::string(":[0-9]+ Failed to sync.*"))));
     }
+    for (const test::Writer &writer : test::kAppenders) {
+        const std::string made = dir / writer.name;
+        log.Clear();
+        test::FailCalls(Call::fsync_directory, EIO);
+        EXPECT_EQ(writer.write(made.c_str()), 1) << writer.name;
+        test::FailCalls(Call::none, 0);
+        EXPECT_THAT(log.Texts(),
+                    ElementsAre(testing::MatchesRegex(writer.module + std::string(":[0-9]+ Failed to sync.*"))));
+    }
+}
+
+TEST(FailingCalls, OfTheSystemSettingsReleaseTheirLock)
+{
+    if (::access("/etc.defaults/tavoinfo.conf", F_OK) != 0)
+        GTEST_SKIP() << "only in an appliance root";
+    test::WriteFile("/etc/tavoinfo.conf", "runsamba=no\n");
+    test::FailCalls(Call::write, ENOSPC);
+    EXPECT_EQ(TAVOINFOSetKeyValue("runsamba", "yes"), -1);
+    test::FailCalls(Call::none, 0);
+    EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, "file_set_key_value"}));
+    EXPECT_EQ(rgslckList[0].pfLock, nullptr);
+    EXPECT_EQ(test::ReadFile("/etc/tavoinfo.conf"), "runsamba=no\n");
 }
 
 // A file system of 64 KiB of its own.
@@ -141,6 +166,32 @@ TEST_F(FullDisk, FailsEveryWriterAndLeavesTheOldText)
     }
     ::unlink(ballast_.c_str());
     EXPECT_EQ(TLIBFileSetKeyValue(file_.c_str(), "key", "new", nullptr), 1) << "with room it works";
+}
+
+TEST_F(FullDisk, FailsEveryAppenderAndWhateverMakesAFile)
+{
+    Fill(0);
+    const char *file = file_.c_str();
+    for (const test::Writer &writer : test::kAppenders) {
+        EXPECT_LE(writer.write(file), 0) << writer.name;
+        EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, writer.module}));
+        EXPECT_EQ(test::ReadFile(file_), text_) << writer.name;
+    }
+    EXPECT_EQ(TLIBErrLogSet(file, "message"), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, "error_log_set", 52}));
+    EXPECT_EQ(test::ReadFile(file_), text_);
+
+    const std::string made = dir_ / "made";
+    const test::Writer creators[] = {test::kRewriters[0], test::kRewriters[2], test::kAppenders[0],
+                                     test::kAppenders[1]};
+    for (const test::Writer &writer : creators) {
+        EXPECT_LE(writer.write(made.c_str()), 0) << writer.name;
+        EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, writer.module}));
+        EXPECT_THAT(dir_.Names(), ElementsAre("ballast", "file")) << writer.name;
+    }
+    EXPECT_EQ(TAVOProcPidFileCreate(made.c_str()), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, "proc_pid_file_create"}));
+    EXPECT_EQ(TLIBReadPidFile(made.c_str()), 0) << "half a number would be another process";
 }
 
 TEST_F(FullDisk, TakesBackHalfAnAppend)

@@ -18,6 +18,7 @@ int calls_made;
 Call failing = Call::none;
 int failing_with;
 Syncs syncs;
+char renamed_from[4096];
 
 bool Reached()
 {
@@ -56,6 +57,11 @@ void FailCalls(Call call, int error)
 {
     failing = call;
     failing_with = error;
+}
+
+const char *RenamedFrom()
+{
+    return renamed_from;
 }
 
 Syncs TakeSyncs()
@@ -112,6 +118,7 @@ int fchown(int fd, uid_t owner, gid_t group) noexcept
 
 int rename(const char *from, const char *to) noexcept
 {
+    std::snprintf(test::renamed_from, sizeof test::renamed_from, "%s", from);
     return Fails(Call::rename) ? -1 : ::renameat(AT_FDCWD, from, AT_FDCWD, to);
 }
 }

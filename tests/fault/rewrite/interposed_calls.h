@@ -18,6 +18,9 @@ enum class Call { none, fstat, write, fsync_file, fsync_directory, fchmod, fchow
 // From now on these calls fail with this errno.
 void FailCalls(Call call, int error);
 
+// The name that the last rename took away.
+const char *RenamedFrom();
+
 // How often each was made since the last question.
 struct Syncs {
     int files = 0;

@@ -88,6 +88,40 @@ TEST_F(Planted, TheScratchFileOfALivingProcessStays)
     EXPECT_NE(::access(kScratch, F_OK), 0) << "nothing is left where new homes are copied from";
 }
 
+// In /tmp a link may be somebody's trap; anywhere else it is the administrator's own.
+TEST_F(Planted, LinksInAPublicDirectoryAreNotFollowed)
+{
+    const std::string open_dir = dir_ / "open";
+    ASSERT_EQ(::mkdir(open_dir.c_str(), 0755), 0);
+    ASSERT_EQ(::chmod(open_dir.c_str(), 01777), 0);
+    const std::string trap = open_dir + "/trap", dangling = open_dir + "/dangling", link = dir_ / "link";
+    ASSERT_EQ(::symlink(victim_.c_str(), trap.c_str()), 0);
+    ASSERT_EQ(::symlink((dir_ / "nologin").c_str(), dangling.c_str()), 0);
+    ASSERT_EQ(::symlink(file_.c_str(), link.c_str()), 0);
+    test::WriteFile(victim_, test::kOldText);
+    test::WriteFile(file_, test::kOldText);
+    for (const std::string &path : {trap, dangling}) {
+        const auto refuses = [&](const test::Writer &writer) {
+            EXPECT_LE(writer.write(path.c_str()), 0) << writer.name << " " << path;
+            EXPECT_EQ(test::LastFault(), (test::Fault{ERR_OPEN_FAILED, writer.module})) << path;
+        };
+        for (const test::Writer &writer : test::kRewriters)
+            refuses(writer);
+        for (const test::Writer &writer : test::kAppenders)
+            refuses(writer);
+        EXPECT_EQ(TLIBFileTouch(path.c_str()), -1) << path;
+    }
+    EXPECT_EQ(test::ReadFile(victim_), test::kOldText);
+    std::string text = test::kOldText;
+    for (const test::Writer &writer : test::kAppenders) {
+        EXPECT_EQ(writer.write(link.c_str()), 1) << writer.name;
+        EXPECT_TRUE(test::ReadFile(file_).starts_with(text)) << writer.name;
+        EXPECT_GT(test::ReadFile(file_).size(), text.size()) << writer.name;
+        text = test::ReadFile(file_);
+    }
+    EXPECT_THAT(dir_.Names(), ElementsAre("file", "link", "open", "victim"));
+}
+
 TEST_F(Planted, WhatIsNoFileIsRefusedAtOnce)
 {
     const std::string fifo = dir_ / "fifo";
