@@ -26,6 +26,7 @@ struct World {
     List other = test::MakeList({"c", "d", kLarge});
     List sorted = test::MakeList({"c", "d"}, TLIB_SZLIST_SORTED);
     Hash hash;
+    Hash wide;  // its key does not fit into the list
     List made;
     Hash made_hash;
     char buffer[16] = "#";
@@ -34,6 +35,8 @@ struct World {
     {
         hash.reset(PshTLIBSzHashAlloc(64));
         test::Moving(hash, [](auto **addr) { return TLIBSzHashSetValue(addr, "key", "value"); });
+        wide.reset(PshTLIBSzHashAlloc(64));
+        test::Moving(wide, [](auto **addr) { return TLIBSzHashSetValue(addr, kLarge.c_str(), "value"); });
         test::Moving(list, [](auto **addr) { return TLIBSzListInsert(addr, 4, "hole before"); });
         TLIBISzListClean(list.get());
     }
@@ -88,6 +91,18 @@ void FailEachAllocation(const Row &row)
         }
     }
     EXPECT_EQ(faults.Count(), row.allocations);
+}
+
+// Calls a step that hands back the world's hash, which it may have moved, or NULL.
+template <class Step>
+bool Replaces(Hash &hash, Step step)
+{
+    TLIBSZHASH *moved = step(hash.get());
+    if (moved) {
+        (void)hash.release();
+        hash.reset(moved);
+    }
+    return moved != nullptr;
 }
 
 // Calls a function that may move the world's list or hash.
@@ -145,6 +160,10 @@ TEST(ContainerFault, EveryAllocationFailsOnce)
          [](World &w) { return Keep(w, PslTLIBSzListSub(w.list.get(), w.sorted.get(), TLIB_SZLIST_NEW)); },
          {0x0200, "list_sub"},
          1},
+        {"list sub, with itself",
+         [](World &w) { return Keep(w, PslTLIBSzListSub(w.list.get(), w.list.get(), 0)); },
+         {0x0200, "list_sub"},
+         1},
         {"list or, new",
          [](World &w) {
              TLIBSZLIST *a = w.list.get();
@@ -174,28 +193,67 @@ TEST(ContainerFault, EveryAllocationFailsOnce)
          [](World &w) { return Moves(w.hash, [](auto **a) { return TLIBSzHashSetValue(a, "key", kLarge.c_str()); }); },
          no_code, 1},
         {"hash resize",
+         [](World &w) { return Replaces(w.hash, [](TLIBSZHASH *hash) { return PshTLIBIReSizeHash(hash, 50, 500); }); },
+         no_code, 1},
+        {"hash check space",
+         [](World &w) { return Replaces(w.hash, [](TLIBSZHASH *hash) { return PshTLIBICheckSpace(hash, 5000); }); },
+         no_code, 1},
+        {"hash insert new pair",
          [](World &w) {
-             TLIBSZHASH *resized = PshTLIBIReSizeHash(w.hash.get(), 50, 500);
-             if (resized) {
-                 (void)w.hash.release();
-                 w.hash.reset(resized);
-             }
-             return resized != nullptr;
+             int slot = -1;
+             return Replaces(w.hash, [&](TLIBSZHASH *hash) {
+                 return PshTLIBIInsertNewPair(hash, &slot, "another", kLarge.c_str());
+             });
+         },
+         no_code, 1},
+        {"hash update value",
+         [](World &w) {
+             int slot = TLIBIGetLookDict(w.hash.get(), "key");
+             return Replaces(w.hash,
+                             [&](TLIBSZHASH *hash) { return PshTLIBIUpdateValue(hash, &slot, "key", kLarge.c_str()); });
          },
          no_code, 1},
         {"hash enum",
          [](World &w) { return Moves(w.list, [&](auto **a) { return TLIBSzHashEnumKey(w.hash.get(), a); }); },
          {},
          0},
+        {"hash enum, growing",
+         [](World &w) { return Moves(w.list, [&](auto **a) { return TLIBSzHashEnumKey(w.wide.get(), a); }); },
+         {0x0200, "list_insert", 72},
+         1},
         {"upper",
          [](World &w) { return TLIBUnicodeUTF8StrUpper("short", w.buffer, 16) > 0; },
          {0x0200, "unicode_utf8_str_upper"},
          1},
+        {"upper, long",
+         [](World &) { return TLIBUnicodeUTF8StrUpper(kLarge.c_str(), nullptr, 0) > 0; },
+         {0x0200, "unicode_utf8_str_upper"},
+         2},
         {"case compare", [](World &) { return TLIBUnicodeUTF8StrCaseCmp(kLarge.c_str(), kLarge.c_str()) == 0; }, {}, 0},
         {"colon", [](World &w) { return TLIBStrEncodeColon("a:b", w.buffer, 16) > 0; }, {}, 0},
     };
     for (const Row &row : rows)
         FailEachAllocation(row);
+}
+
+// A value that the hash has given up may stand just where the new key goes: it is set aside first.
+TEST(ContainerFault, AValueInTheWayOfItsKey)
+{
+    test::EachAllocation faults;
+    while (faults.Next()) {
+        World world;
+        const char *stale = SzTLIBSzHashGetValue(world.hash.get(), "key");
+        PslSzHashRemoveAll(world.hash.get());
+        faults.Arm();
+        const bool set =
+            Moves(world.hash, [&](auto **a) { return TLIBSzHashSetValue(a, "a longer key than that", stale); });
+        faults.Disarm();
+        EXPECT_EQ(set, !faults.Fired());
+        EXPECT_EQ(faults.LeftAllocated(), 0);
+        EXPECT_EQ(TLIBSzHashPairNum(world.hash.get()), set ? 1 : 0);
+        EXPECT_EQ(world.hash->nStrFree, world.hash->nStrSize - (set ? 23 + 6 : 0));
+    }
+    EXPECT_EQ(faults.Count(), 1);
 }
 
 }  // namespace
