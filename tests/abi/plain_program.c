@@ -32,6 +32,9 @@ int main(void)
     volerr = 7;
     check(TAVOVolGetErr() == 7, "volerr likewise");
     check(rgslckList[0].fLockBit == 0x800 && rgslckList[20].fLockBit == 0, "the lock table is readable");
+    check(grgAllTavoPartLayout[0].nVersion != 0 && sizeof grgAllTavoPartLayout == 920, "so are the layouts");
+    check(PartType[0].szName != NULL && PartType[48].szName == NULL, "and the partition types");
+    check(FHOSTHeaderSize == (int)sizeof stFHOSTHeader, "and the packets of discovery");
 
     check(TLIBSzListPush(&list, "one") == 0 && strcmp(SzTLIBSzListGet(list, 0), "one") == 0, "a list works");
     TLIBSzListFree(list);

@@ -1,6 +1,7 @@
 // The locks: counting, refusals, time-outs, forked children, and what others may have put in /tmp.
 #include "tavo_lock.h"
 
+#include "support/descriptors.h"
 #include "support/failing_malloc.h"
 #include "support/fault_state.h"
 
@@ -126,14 +127,6 @@ bool InChild(const std::function<bool()> &body)
     return status == 0;
 }
 
-size_t OpenDescriptors()
-{
-    size_t count = 0;
-    for (int fd = 0; fd < 1024; ++fd)
-        count += ::fcntl(fd, F_GETFD) >= 0;
-    return count;
-}
-
 TEST(LockTable, IsTheKnownOne)
 {
     const struct {
@@ -205,7 +198,7 @@ TEST_F(Lock, SharedDoesNotBecomeExclusive)
 TEST_F(Lock, TriesAgainTwentyTimesASecond)
 {
     ForeignHold busy(0x100, LOCK_EX);
-    const size_t descriptors = OpenDescriptors();
+    const int descriptors = test::OpenDescriptors();
     const struct {
         int timeout;
         size_t retries;
@@ -216,7 +209,7 @@ TEST_F(Lock, TriesAgainTwentyTimesASecond)
         EXPECT_EQ(ErrTLIBFileLock(0x906, row.timeout), -1);
         EXPECT_EQ(sleeps, std::vector<long long>(row.retries, kRetry)) << row.timeout;
         EXPECT_EQ(LastFault(), (Fault{ERR_LOCK_FAILED, "file_lock", 87}));
-        EXPECT_EQ(OpenDescriptors(), descriptors);
+        EXPECT_EQ(test::OpenDescriptors(), descriptors);
         EXPECT_EQ(Entry(0x800).pfLock, nullptr) << "all or nothing";
         EXPECT_EQ(Entry(0x100).pfLock, nullptr);
         EXPECT_EQ(Entry(0x100).nRef, 0);
@@ -277,7 +270,7 @@ TEST_F(Lock, RefusesWhatIsNoWayToLock)
 
 TEST_F(Lock, OutOfMemoryTakesNothing)
 {
-    const size_t descriptors = OpenDescriptors();
+    const int descriptors = test::OpenDescriptors();
     test::EachAllocation faults;
     while (faults.Next()) {
         faults.Arm();
@@ -287,7 +280,7 @@ TEST_F(Lock, OutOfMemoryTakesNothing)
         faults.Disarm();
         EXPECT_EQ(result, faults.Fired() ? -1 : 0);
         EXPECT_EQ(faults.LeftAllocated(), 0);
-        EXPECT_EQ(OpenDescriptors(), descriptors);
+        EXPECT_EQ(test::OpenDescriptors(), descriptors);
         if (faults.Fired()) {
             EXPECT_EQ(LastFault(), (Fault{ERR_LOCK_FAILED, "file_lock", 87}));
         }

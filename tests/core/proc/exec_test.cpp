@@ -3,6 +3,7 @@
 #include "tavo_proc.h"
 
 #include "own_child.h"
+#include "support/descriptors.h"
 #include "support/fault_state.h"
 #include "support/scratch_dir.h"
 
@@ -15,6 +16,7 @@
 #include <vector>
 
 #include <dlfcn.h>
+#include <fcntl.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/syscall.h>

@@ -5,7 +5,6 @@
 #include <cerrno>
 #include <csignal>
 
-#include <fcntl.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -89,14 +88,6 @@ class ChildAction {
 inline bool HasNoChildren()
 {
     return ::waitpid(-1, nullptr, WNOHANG) == -1 && errno == ECHILD;
-}
-
-inline int OpenDescriptors()
-{
-    int count = 0;
-    for (int fd = 0; fd < 1024; ++fd)
-        count += ::fcntl(fd, F_GETFD) >= 0;
-    return count;
 }
 
 }  // namespace test

@@ -2,6 +2,7 @@
 #include "tavo_proc.h"
 
 #include "own_child.h"
+#include "support/descriptors.h"
 #include "support/failing_malloc.h"
 #include "support/fault_state.h"
 #include "support/scratch_dir.h"
@@ -79,7 +80,9 @@ class Ps : public testing::Test {
             SCOPED_TRACE(ps ? "a ps without -I" : "a ps with -I");
             other_ps = ps;
             test::ForgetFault();
+            const int descriptors = test::OpenDescriptors();
             body();
+            EXPECT_EQ(test::OpenDescriptors(), descriptors);
             EXPECT_FALSE(::access(scratch_.c_str(), F_OK) == 0) << "the scratch file stays behind";
         }
     }

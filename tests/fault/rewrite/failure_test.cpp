@@ -1,6 +1,7 @@
 // Calls that fail and disks that are full: every writer reports its code and leaves the old text, and no other file.
 #include "interposed_calls.h"
 #include "support/captured_log.h"
+#include "support/descriptors.h"
 #include "support/fault_state.h"
 #include "support/scratch_dir.h"
 #include "tavo_error.h"
@@ -39,6 +40,7 @@ TEST(FailingCalls, GiveTheirCodes)
     };
     const test::ScratchDir dir;
     const std::string file = dir / "file";
+    const int descriptors = test::OpenDescriptors();
     for (const Row &row : rows) {
         for (const test::Writer &writer : test::kRewriters) {
             test::WriteFile(file, kOldText);
@@ -52,6 +54,7 @@ TEST(FailingCalls, GiveTheirCodes)
             EXPECT_THAT(dir.Names(), ElementsAre("file")) << writer.name;
         }
     }
+    EXPECT_EQ(test::OpenDescriptors(), descriptors);
 }
 
 TEST(FailingCalls, OfAnAppendTakeItBack)

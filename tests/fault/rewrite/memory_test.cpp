@@ -1,5 +1,6 @@
 // Memory that runs out at any allocation: the code says so, nothing has changed, nothing is left allocated.
 #include "support/captured_log.h"
+#include "support/descriptors.h"
 #include "support/failing_malloc.h"
 #include "support/fault_state.h"
 #include "support/scratch_dir.h"
@@ -26,6 +27,7 @@ TEST(OutOfMemory, LeavesTheOldText)
     const test::ScratchDir dir;
     const std::string file = dir / "file";
     test::NewPairs();  // made before anything fails
+    const int descriptors = test::OpenDescriptors();
     const auto check = [&](const test::Writer &writer) {
         test::WriteFile(file, kOldText);
         EXPECT_EQ(writer.write(file.c_str()), 1) << writer.name;
@@ -38,6 +40,7 @@ TEST(OutOfMemory, LeavesTheOldText)
             const int result = writer.write(file.c_str());
             faults.Disarm();
             EXPECT_EQ(faults.LeftAllocated(), 0) << writer.name;
+            EXPECT_EQ(test::OpenDescriptors(), descriptors) << writer.name;
             if (!faults.Fired()) {
                 EXPECT_EQ(result, 1) << writer.name;
                 continue;
@@ -71,6 +74,7 @@ TEST(OutOfMemory, FailsEveryReader)
     test::WriteFile(file, text + "[big]\nx=" + value + "\n");
 
     const auto check = [](const char *name, auto &&call) {
+        const int descriptors = test::OpenDescriptors();
         test::EachAllocation faults;
         while (faults.Next()) {
             test::StringHash hash;
@@ -87,6 +91,7 @@ TEST(OutOfMemory, FailsEveryReader)
             }
             TLIBSzListFree(list);
         }
+        EXPECT_EQ(test::OpenDescriptors(), descriptors) << name;
         EXPECT_GT(faults.Count(), 0) << name;
     };
     check("GetKeyValue", [&](auto, auto) { return TLIBFileGetKeyValue(path, "key7", nullptr, 0, 0); });
@@ -161,6 +166,7 @@ TEST(OutOfMemory, FailsTheRest)
          {ERR_OUT_OF_MEMORY, "file_hash_2_file"}},
     };
     for (const Row &row : rows) {
+        const int descriptors = test::OpenDescriptors();
         test::EachAllocation faults;
         while (faults.Next()) {
             ::unlink(path);
@@ -178,6 +184,7 @@ TEST(OutOfMemory, FailsTheRest)
                 EXPECT_EQ(test::ReadFile(dir / "stream"), "") << row.name;
             }
         }
+        EXPECT_EQ(test::OpenDescriptors(), descriptors) << row.name;
         EXPECT_GT(faults.Count(), 0) << row.name;
     }
     std::fclose(stream);
