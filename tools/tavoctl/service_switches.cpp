@@ -110,7 +110,7 @@ struct Enable {
     static constexpr bool starts = true;
     static constexpr VerbInfo info = {
         "enable", changes | tells_before,
-        "Enables services: binds their data folders, on the volume where they are or else on the one with the most "
+        "Enables services. Binds their data folders, on the volume where they are or else on the one with the most "
         "free "
         "space, sets their keys and starts them. With --dry-run, lists the folders that it would bind.",
         "tavoctl service enable samba\n"
@@ -123,7 +123,7 @@ struct Disable {
     static constexpr bool starts = false;
     static constexpr VerbInfo info = {
         "disable", changes,
-        "Disables services: sets their keys, stops them and releases their data folders. Data is not deleted, and a "
+        "Disables services. Sets their keys, stops them and releases their data folders. Data is not deleted, and a "
         "folder that another enabled service uses stays bound.",
         "tavoctl service disable telnet"};
 };
@@ -272,7 +272,7 @@ class ServiceRestore : public Verb {
   public:
     static constexpr VerbInfo info = {
         "restore", changes,
-        "Brings services back after their volume has come back: binds the data folders that are on it again and starts "
+        "Brings services back after their volume has come back. Binds the data folders that are on it again and starts "
         "the enabled services that use them. Without VOLUME: enables the services again that have lost theirs, on the "
         "volumes that there are.",
         "tavoctl service restore /volume1\n"
