@@ -4,17 +4,21 @@
 #include "core/detail/guard.h"
 #include "core/detail/line_format.h"
 
+#include <iterator>
+
 namespace {
 
+// Conversion by conversion: the end of a "%%" and an "s" behind it are no "%s".
 bool InOrder(std::string_view format)
 {
-    for (const std::string_view piece : {"%s", "=", "%s", "\n"}) {
-        const size_t at = format.find(piece);
-        if (at == format.npos)
-            return false;
-        format.remove_prefix(at + piece.size());
+    constexpr std::string_view pieces[] = {"%s", "=", "%s", "\n"};
+    size_t found = 0;
+    while (!format.empty() && found < std::size(pieces)) {
+        const std::string_view piece = format.substr(0, format.front() == '%' ? 2 : 1);
+        found += piece == pieces[found];
+        format.remove_prefix(piece.size());
     }
-    return true;
+    return found == std::size(pieces);
 }
 
 }  // namespace

@@ -209,11 +209,11 @@ TEST_F(SectionTest, WritesAHashToAStream)
 TEST_F(SectionTest, ChecksFormats)
 {
     for (const char *format :
-         {static_cast<const char *>(nullptr), "%s=%s\n", "%s = \"%s\"\n", "  %s=%%%s%%\nx", "%s==%s;\n"})
+         {static_cast<const char *>(nullptr), "%s=%s\n", "%s = \"%s\"\n", "  %s=%%%s%%\nx", "%s==%s;\n", "%%s %s=%s\n"})
         EXPECT_EQ(TLIBIFileCheckFormat(format), 0) << format;
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
     for (const char *format : {"", "%s=%s", "%s%s\n", "=%s%s\n", "%s=\n", "%s\n=%s", "%s=%s\n%s", "%n%s=%s\n",
-                               "%s%d=%s\n", "%%s=%s\n", "%s=%%s\n", "%s=%s\n%"}) {
+                               "%s%d=%s\n", "%%s=%s\n", "%s=%%s\n", "%s=%s\n%", "%%s=%s%s\n"}) {
         test::ForgetFault();
         EXPECT_EQ(TLIBIFileCheckFormat(format), -1) << format;
         EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_check_format"})) << format;
