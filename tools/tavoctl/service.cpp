@@ -83,7 +83,8 @@ class ServiceList : public Verb {
   public:
     static constexpr VerbInfo info = {
         "list", reads,
-        "Lists the services that this model has. Whether each is enabled and running, the process and since when, its "
+        "Lists the services that this model has. Shows whether each is enabled and running, the process and since "
+        "when, its "
         "data folders and the volumes where they are. \"bound\" says whether all of them are there.",
         "tavoctl service list\n"
         "tavoctl service list --all --json\n"
