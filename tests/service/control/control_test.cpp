@@ -272,7 +272,7 @@ TEST(NetService, ScriptThatLocksFailsInTime)
 TEST(NetService, TwoProcessesNeverInterleave)
 {
     for (const char *script : {"S04crond.sh", "S99mDNS.sh"})
-        test::WriteFile(std::string("/var/standin/") + script + ".hook", "#!/bin/sh\nusleep 30000\n", 0755);
+        test::WriteFile(std::string("/var/standin/") + script + ".hook", "#!/bin/sh\nsleep 0.03\n", 0755);
     std::vector<pid_t> children;
     for (int i = 0; i < 2; ++i) {
         const pid_t child = ::fork();

@@ -7,7 +7,8 @@ if machine; then far=eth1; fi
 if [ -d "/sys/class/net/${far:-none}" ]; then
     say 'Other appliances: findhostd answers them and lists who answers us'
     # At the other end of the cable.
-    unshare -n -u -m sh -c 'mount -t tmpfs run /var/run && mount -t tmpfs tmp /tmp && hostname cellar
+    unshare -n -u -m sh -c 'mount -t tmpfs run /var/run && mount -t tmpfs tmp /tmp
+        hostname cellar 2>/dev/null || echo cellar >/proc/sys/kernel/hostname
         echo $$ >/dev/shm/cellar
         until ifconfig '$far' 192.0.2.7 netmask 255.255.255.0 up 2>/dev/null; do sleep 0.1; done
         exec /usr/tavo/bin/findhostd --foreground' &
