@@ -48,6 +48,7 @@ class Bond : public Cards {
         AddCard("eth1");
         Plain();
         std::filesystem::remove(kCalls);
+        WriteFile("/var/standin/rc.network.status", "0");  // the cards are no real ones
     }
 
     static void Plain()
@@ -179,7 +180,6 @@ TEST_F(Bond, ANetworkThatDoesNotStartIsSaidSo)
 {
     WriteFile("/var/standin/rc.network.status", "1");
     EXPECT_EQ(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}), -1);
-    std::filesystem::remove("/var/standin/rc.network.status");
     EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_link_aggr_set"}));
 }
 
