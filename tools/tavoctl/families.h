@@ -1,4 +1,4 @@
-// The families of commands. A new one is a file of its own, named like the family, and a line in each list here.
+// The families of commands. A new one is a file of its own in its area, named like the family, and a line in each list.
 #ifndef TAVOCTL_FAMILIES_H
 #define TAVOCTL_FAMILIES_H
 

@@ -1,5 +1,5 @@
 // tavoctl: what an administrator or a script runs to read and change the state of the appliance.
-#include "program.h"
+#include "frame/program.h"
 
 int main(int argc, char **argv)
 {

@@ -1,0 +1,194 @@
+// Lists of accounts in files.
+#include "account/account_rows.h"
+
+#include "frame/failure.h"
+
+#include <nlohmann/json.hpp>
+
+#include <algorithm>
+#include <cerrno>
+#include <cstring>
+#include <fstream>
+#include <iostream>
+#include <sstream>
+
+#include <fcntl.h>
+#include <unistd.h>
+
+namespace tavoctl {
+namespace {
+
+constexpr std::string_view byte_order_mark = "\xEF\xBB\xBF";
+
+[[noreturn]] void Refuse(const std::string &reason)
+{
+    throw UsageFailure("read the list", reason);
+}
+
+void CheckColumn(const std::string &column, const std::vector<std::string> &columns)
+{
+    if (std::find(columns.begin(), columns.end(), column) == columns.end())
+        Refuse("there is no field \"" + column + "\"");
+}
+
+// One record of comma-separated values; the text behind it is left. A quoted value may hold line ends.
+std::vector<std::string> TakeRecord(std::string_view &text, int &line)
+{
+    std::vector<std::string> values(1);
+    bool quoted = false;
+    std::size_t i = 0;
+    for (; i < text.size(); ++i) {
+        const char c = text[i];
+        if (quoted && c == '"' && i + 1 < text.size() && text[i + 1] == '"') {
+            values.back() += '"';
+            ++i;
+        } else if (c == '"' && (quoted || values.back().empty())) {
+            quoted = !quoted;
+        } else if (!quoted && c == ',') {
+            values.emplace_back();
+        } else if (!quoted && c == '\n') {
+            break;
+        } else if (quoted || c != '\r') {
+            values.back() += c;
+        }
+        line += c == '\n';
+    }
+    if (quoted)
+        Refuse("a quotation mark is not closed before the end");
+    text.remove_prefix(std::min(i + 1, text.size()));
+    ++line;
+    return values;
+}
+
+std::vector<AccountRow> ParseCsv(std::string_view text, const std::vector<std::string> &columns)
+{
+    int line = 1;
+    const std::vector<std::string> heads = TakeRecord(text, line);
+    for (const std::string &head : heads) {
+        CheckColumn(head, columns);
+        if (std::count(heads.begin(), heads.end(), head) > 1)
+            Refuse("the column \"" + head + "\" is there twice");
+    }
+    std::vector<AccountRow> rows;
+    while (!text.empty()) {
+        AccountRow row = {line, {}};
+        const std::vector<std::string> values = TakeRecord(text, line);
+        if (values.size() == 1 && values[0].empty())
+            continue;
+        if (values.size() != heads.size())
+            Refuse(row.Where() + " has " + std::to_string(values.size()) + " fields and not " +
+                   std::to_string(heads.size()));
+        for (std::size_t i = 0; i < heads.size(); ++i)
+            row.fields.emplace(heads[i], values[i]);
+        rows.push_back(std::move(row));
+    }
+    return rows;
+}
+
+std::string JsonText(const nlohmann::json &value, const AccountRow &row)
+{
+    if (value.is_string())
+        return value.get<std::string>();
+    if (value.is_number_integer())
+        return std::to_string(value.get<int64_t>());
+    if (value.is_boolean())
+        return value.get<bool>() ? "yes" : "no";
+    if (!value.is_array())
+        Refuse(row.Where() + " holds a value that fits no field");
+    std::string joined;
+    for (const nlohmann::json &item : value)
+        joined += (joined.empty() ? "" : ",") + JsonText(item, row);
+    return joined;
+}
+
+std::vector<AccountRow> ParseJson(std::string_view text, const std::vector<std::string> &columns)
+{
+    const nlohmann::json list = nlohmann::json::parse(text, nullptr, false);
+    if (!list.is_array())
+        Refuse("it is no JSON array");
+    std::vector<AccountRow> rows;
+    for (const nlohmann::json &object : list) {
+        AccountRow row = {static_cast<int>(rows.size()) + 1, {}};
+        if (!object.is_object())
+            Refuse(row.Where() + " is no object");
+        for (const auto &[column, value] : object.items()) {
+            CheckColumn(column, columns);
+            if (!value.is_null())
+                row.fields.emplace(column, JsonText(value, row));
+        }
+        rows.push_back(std::move(row));
+    }
+    return rows;
+}
+
+}  // namespace
+
+const std::string *AccountRow::Find(const std::string &column) const
+{
+    const auto found = fields.find(column);
+    return found == fields.end() ? nullptr : &found->second;
+}
+
+std::string AccountRow::Where() const
+{
+    return "row " + std::to_string(number);
+}
+
+std::vector<AccountRow> ParseAccountRows(std::string_view text, const std::vector<std::string> &columns)
+{
+    if (text.starts_with(byte_order_mark))
+        text.remove_prefix(byte_order_mark.size());
+    if (text.find('\0') != std::string_view::npos)
+        Refuse("it is no text");
+    const std::size_t begin = text.find_first_not_of(" \t\r\n");
+    if (begin == std::string_view::npos)
+        return {};
+    const bool json = text[begin] == '[' || text[begin] == '{';
+    std::vector<AccountRow> rows = json ? ParseJson(text, columns) : ParseCsv(text, columns);
+    for (const AccountRow &row : rows)
+        if (const std::string *name = row.Find("name"); !name || name->empty())
+            Refuse(row.Where() + " has no name");
+    return rows;
+}
+
+std::string ReadWhole(const std::string &path)
+{
+    std::ostringstream text;
+    std::ifstream file;
+    errno = 0;
+    if (path != "-")
+        file.open(path, std::ios::binary);
+    std::istream &in = path == "-" ? std::cin : file;
+    if (in.peek() != std::istream::traits_type::eof())
+        text << in.rdbuf();
+    const bool opened = path == "-" || file.is_open();
+    if (!opened || in.bad() || errno == EISDIR)
+        throw Failure{.attempted = "read " + path,
+                      .reason = std::strerror(errno),
+                      .status = errno == ENOENT ? exit_not_found : exit_failed};
+    return text.str();
+}
+
+void WriteWhole(const std::string &path, const std::string &text)
+{
+    if (path.empty()) {
+        std::cout << text;
+        return;
+    }
+    const int fd = ::open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600);
+    std::size_t written = 0;
+    while (fd >= 0 && written < text.size()) {
+        const ssize_t count = ::write(fd, text.data() + written, text.size() - written);
+        if (count < 0 && errno != EINTR)
+            break;
+        written += count > 0 ? static_cast<std::size_t>(count) : 0;
+    }
+    const bool whole = fd >= 0 && written == text.size() && ::fsync(fd) == 0;
+    const int error = errno;
+    if (fd >= 0)
+        ::close(fd);
+    if (!whole)
+        throw Failure{.attempted = "write " + path, .reason = std::strerror(error)};
+}
+
+}  // namespace tavoctl

@@ -1,0 +1,68 @@
+// What tavoctl asks of accounts beyond the library.
+#include "account/account_rules.h"
+
+#include "account/user_record.h"
+#include "frame/failure.h"
+#include "frame/terminal_text.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <fstream>
+#include <iostream>
+
+#include <strings.h>
+
+namespace tavoctl {
+
+void Warn(const std::string &text)
+{
+    std::cerr << "tavoctl: warning: " + Printable(text) + "\n";
+}
+
+void WarnOfName(const std::string &name)
+{
+    if (name.find_first_not_of("0123456789") == std::string::npos)
+        Warn("many programs take the name " + name + " for an id");
+    if (name.find(' ') != std::string::npos)
+        Warn("some programs do not understand the blank in \"" + name + "\"");
+    if (std::any_of(name.begin(), name.end(), [](char c) { return static_cast<unsigned char>(c) >= 0x80; }))
+        Warn("letters of the name " + name + " may look like others");
+}
+
+int LastUserId()
+{
+    std::ifstream in("/etc/tavouser.conf");
+    std::string line;
+    int last = -1;
+    return std::getline(in, line) && std::sscanf(line.c_str(), "#$_@UID__INDEX@_$%d$", &last) == 1 ? last : -1;
+}
+
+void WarnOfReusedId(const std::string &name, int uid, int last_before)
+{
+    if (uid <= last_before)
+        Warn("the user id " + std::to_string(uid) + " was somebody's before: files that he left now belong to " + name);
+}
+
+void RefuseTakenId(const std::string &name, int uid)
+{
+    const std::optional<User> holder = FindUserById(uid);
+    if (holder && ::strcasecmp(holder->name.c_str(), name.c_str()) != 0)
+        throw UsageFailure("give " + name + " the user id " + std::to_string(uid), "it is that of " + holder->name);
+}
+
+void RefuseTooMany(int additions, const std::string &attempted)
+{
+    constexpr int unknown = -1;  // the model names no limit
+    const int left = TAVOConfGetUserLimit();
+    if (left != unknown && left < additions)
+        throw Failure{.attempted = attempted, .code = ERR_TOO_MANY_USERS};
+}
+
+bool ParseYesNo(const std::string &what, const std::string &text)
+{
+    if (text != "yes" && text != "no")
+        throw UsageFailure("understand " + what + " " + text, "it is neither yes nor no");
+    return text == "yes";
+}
+
+}  // namespace tavoctl

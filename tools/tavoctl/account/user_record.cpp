@@ -1,0 +1,217 @@
+// A user as tavoctl handles one.
+#include "account/user_record.h"
+
+#include "frame/containers.h"
+#include "frame/error_codes.h"
+#include "frame/failure.h"
+
+#include <algorithm>
+#include <charconv>
+#include <cstdio>
+#include <ctime>
+
+#include <strings.h>
+
+namespace tavoctl {
+namespace {
+
+constexpr std::size_t named_at_most = 5;
+constexpr time_t day_seconds = 86400;
+
+char *Pointer(const std::string &text)
+{
+    return const_cast<char *>(text.c_str());  // the library's record has no const; it does not write
+}
+
+struct Owned {
+    TAVOUSER *user = nullptr;
+    ~Owned() { TAVOUserFree(user); }
+};
+
+User FromRecord(const TAVOUSER &record)
+{
+    return {.name = record.szName,
+            .password = record.szPasswd,
+            .uid = record.nUid,
+            .gid = record.nGid,
+            .description = record.szDesc,
+            .home = record.szHome,
+            .shell = record.szShell,
+            .mail = record.szMail,
+            .expires = record.nExpired,
+            .cannot_change_password = record.fCannotChgPasswd != 0,
+            .kind = record.nKind,
+            .privilege = record.nPrivilege};
+}
+
+template <class Get>
+std::optional<User> Find(const std::string &attempted, Get get)
+{
+    Owned owned;
+    if (get(&owned.user) == 0)
+        return FromRecord(*owned.user);
+    if (TLIBErrGet() == ERR_NO_SUCH_USER || TLIBErrGet() == ERR_INVALID_USERNAME)
+        return {};
+    throw LibraryFailure(attempted);
+}
+
+bool SameTexts(const User &a, const User &b)
+{
+    return a.name == b.name && a.description == b.description && a.shell == b.shell && a.mail == b.mail;
+}
+
+// Whether the account is what the change made of it. Where the library chooses, whatever it chose is right.
+bool IsDone(const UserChange &change)
+{
+    const std::optional<User> now = FindUser(change.user.name);
+    if (!now)
+        return false;
+    User wanted = change.user;
+    if (wanted.shell.empty())
+        wanted.shell = now->shell;
+    return SameTexts(*now, wanted) && (wanted.uid < 0 || now->uid == wanted.uid) &&
+           (wanted.gid < 0 || now->gid == wanted.gid) && std::max(now->expires, -1) == std::max(wanted.expires, -1) &&
+           now->cannot_change_password == wanted.cannot_change_password;
+}
+
+std::string Named(const std::vector<std::string> &names)
+{
+    std::string text;
+    for (std::size_t i = 0; i < names.size() && i < named_at_most; ++i)
+        text += (i ? ", " : "") + names[i];
+    return names.size() > named_at_most ? text + ", ..." : text;
+}
+
+}  // namespace
+
+TAVOUSER User::Record() const
+{
+    TAVOUSER record = {};
+    record.szName = Pointer(name);
+    record.szPasswd = Pointer(password);
+    record.nUid = uid;
+    record.nGid = gid;
+    record.szDesc = Pointer(description);
+    record.szHome = Pointer(home);
+    record.szShell = Pointer(shell);
+    record.nExpired = expires;
+    record.fCannotChgPasswd = cannot_change_password;
+    record.szMail = Pointer(mail);
+    record.nKind = kind;
+    record.nPrivilege = privilege;
+    return record;
+}
+
+std::optional<User> FindUser(const std::string &name)
+{
+    return Find("read the user " + name, [&](TAVOUSER **record) { return TAVOUserGet(name.c_str(), record); });
+}
+
+std::optional<User> FindUserById(int uid)
+{
+    return Find("read the user with the id " + std::to_string(uid),
+                [&](TAVOUSER **record) { return TAVOUserGetByUID(uid, record); });
+}
+
+User ReadUser(const std::string &name)
+{
+    if (std::optional<User> user = FindUser(name))
+        return *std::move(user);
+    throw NotFound("read the user " + name, ERR_NO_SUCH_USER, "tavoctl user list shows who is there");
+}
+
+std::vector<std::string> UserNames(const std::string &prefix, const std::string &part)
+{
+    StringList names;
+    constexpr int all = TAVO_USER_LOCAL | TAVO_USER_DOMAIN;
+    const int count = part.empty() ? TAVOUserEnumByPrefix(names.Address(), all, prefix.c_str())
+                                   : TAVOUserEnumBySubstr(names.Address(), all, part.c_str());
+    if (count < 0)
+        throw LibraryFailure("list the users");
+    return names.Items();
+}
+
+std::vector<std::string> UserNames()
+{
+    return UserNames({}, {});
+}
+
+void SetUsers(const std::vector<UserChange> &changes, const std::string &attempted)
+{
+    std::vector<TAVOUSER> records;
+    for (const UserChange &change : changes)
+        records.push_back(change.user.Record());
+    std::vector<const TAVOUSER *> users;
+    std::vector<const char *> old_names;
+    for (std::size_t i = 0; i < changes.size(); ++i) {
+        users.push_back(&records[i]);
+        old_names.push_back(changes[i].old_name ? changes[i].old_name->c_str() : nullptr);
+    }
+    TLIBErrSet(ERR_SUCCESS);
+    const int result = TAVOUserSet(old_names.data(), users.data(), static_cast<int>(users.size()));
+    Failure failure = LibraryFailure(attempted);
+    if (result != 0)
+        throw failure;
+    std::vector<std::string> refused;
+    for (const UserChange &change : changes)
+        if (!IsDone(change))
+            refused.push_back(change.user.name);
+    if (refused.empty())
+        return;
+    if (changes.size() > 1)
+        failure.reason = std::to_string(refused.size()) + " of " + std::to_string(changes.size()) +
+                         " were refused, the others are done: " + Named(refused) + "; the last reason";
+    throw failure;
+}
+
+bool IsSystemUser(const User &user)
+{
+    return user.kind == TAVO_USER_KIND_LOCAL && (user.uid < TAVO_USER_UID_MIN || user.uid == TAVO_USER_UID_GUEST);
+}
+
+int ParseExpiry(const std::string &text)
+{
+    if (text.empty() || text == "never")
+        return -1;
+    std::string date = text;
+    std::replace(date.begin(), date.end(), '-', '/');
+    TAVOUSER record = {};
+    // What the library makes of a date before 1970 lies in the future.
+    if (TAVOUserExpiredDateFill(&record, date.c_str()) != 0 || date < "1970/01/01")
+        throw UsageFailure("understand the date " + text, "it is not of the form yyyy/mm/dd, from 1970 on",
+                           "give the last day, or never");
+    return record.nExpired;
+}
+
+Cell ExpiryCell(int day)
+{
+    if (day < 0)
+        return {};
+    const time_t at = time_t{day} * day_seconds;
+    std::tm date = {};
+    ::gmtime_r(&at, &date);
+    char text[32];
+    std::strftime(text, sizeof text, "%Y/%m/%d", &date);
+    return text;
+}
+
+int ParsePrivilege(const std::string &text)
+{
+    const bool hexadecimal = ::strncasecmp(text.c_str(), "0x", 2) == 0;
+    const char *begin = text.c_str() + (hexadecimal ? 2 : 0);
+    const char *end = text.c_str() + text.size();
+    int mask = 0;
+    const auto [stop, error] = std::from_chars(begin, end, mask, hexadecimal ? 16 : 10);
+    if (error != std::errc() || stop != end || mask < 0)
+        throw UsageFailure("understand the privileges " + text, "it is no mask such as 0x23");
+    return mask;
+}
+
+std::string PrivilegeText(int privilege)
+{
+    char text[16];
+    std::snprintf(text, sizeof text, "0x%02X", static_cast<unsigned>(privilege));
+    return text;
+}
+
+}  // namespace tavoctl

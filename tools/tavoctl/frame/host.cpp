@@ -1,0 +1,25 @@
+// Whether this machine is an appliance.
+#include "frame/host.h"
+
+#include "frame/failure.h"
+
+#include <string>
+
+#include <unistd.h>
+
+namespace tavoctl {
+
+bool IsAppliance()
+{
+    return ::access(defaults_file, F_OK) == 0;
+}
+
+void RefuseForeignHost()
+{
+    if (!IsAppliance())
+        throw Failure{.attempted = "change this machine",
+                      .reason = std::string("it is no appliance: there is no ") + defaults_file,
+                      .hint = "say --force-host if you mean it"};
+}
+
+}  // namespace tavoctl

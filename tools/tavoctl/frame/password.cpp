@@ -1,0 +1,133 @@
+// Passwords: from a terminal or from standard input.
+#include "frame/password.h"
+
+#include "frame/failure.h"
+#include "frame/terminal_text.h"
+
+#include <cerrno>
+#include <csignal>
+#include <cstring>
+#include <iterator>
+
+#include <sys/random.h>
+#include <termios.h>
+#include <unistd.h>
+
+namespace tavoctl {
+namespace {
+
+constexpr std::size_t longest = 1024;
+constexpr char hint[] = "type one, send it as the first line of standard input, or say --empty-password";
+
+termios shown;
+
+// Whoever interrupts the question wants to see again what he types.
+extern "C" void ShowAndDie(int signal)
+{
+    ::tcsetattr(STDIN_FILENO, TCSAFLUSH, &shown);
+    ::signal(signal, SIG_DFL);
+    ::raise(signal);
+}
+
+// The terminal does not show what is typed.
+class Hidden {
+  public:
+    Hidden()
+    {
+        ::tcgetattr(STDIN_FILENO, &shown);
+        for (std::size_t i = 0; i < std::size(signals); ++i)
+            saved_[i] = std::signal(signals[i], ShowAndDie);
+        termios hidden = shown;
+        hidden.c_lflag &= ~static_cast<tcflag_t>(ECHO);
+        ::tcsetattr(STDIN_FILENO, TCSADRAIN, &hidden);
+    }
+    ~Hidden()
+    {
+        ::tcsetattr(STDIN_FILENO, TCSADRAIN, &shown);
+        for (std::size_t i = 0; i < std::size(signals); ++i)
+            std::signal(signals[i], saved_[i]);
+    }
+    Hidden(const Hidden &) = delete;
+    Hidden &operator=(const Hidden &) = delete;
+
+  private:
+    static constexpr int signals[] = {SIGINT, SIGQUIT, SIGTERM, SIGHUP};
+    void (*saved_[4])(int) = {};
+};
+
+void Say(const std::string &text)
+{
+    const std::string printable = Printable(text, true);
+    if (::write(STDERR_FILENO, printable.data(), printable.size()) < 0)
+        throw Failure{.attempted = "ask for the password", .reason = std::strerror(errno)};
+}
+
+// Byte by byte, so that what follows the line is left for whoever reads on.
+std::string ReadLine()
+{
+    std::string line;
+    char c = 0;
+    for (;;) {
+        const ssize_t count = ::read(STDIN_FILENO, &c, 1);
+        if (count < 0 && errno == EINTR)
+            continue;
+        if (count < 0)
+            throw Failure{.attempted = "read the password", .reason = std::strerror(errno)};
+        if (count == 0 || c == '\n')
+            return line;
+        if (c == '\0' || line.size() == longest)
+            throw UsageFailure("take the password", "it is too long, or no text");
+        line += c;
+    }
+}
+
+std::string ReadHidden(const std::string &prompt)
+{
+    std::string line;
+    {
+        const Hidden hidden;  // before he sees that he may type
+        Say(prompt);
+        line = ReadLine();
+    }
+    Say("\n");
+    return line;
+}
+
+}  // namespace
+
+std::string AskPassword(const std::string &name)
+{
+    const bool terminal = ::isatty(STDIN_FILENO) && ::isatty(STDERR_FILENO);
+    std::string password = terminal ? ReadHidden("Password of " + name + ": ") : ReadLine();
+    if (password.empty())
+        throw UsageFailure("set the password of " + name, "none was given", hint);
+    if (terminal && ReadHidden("Again: ") != password)
+        throw Failure{.attempted = "set the password of " + name, .reason = "the two differ"};
+    return password;
+}
+
+std::string UnknownPassword()
+{
+    unsigned char bytes[32];
+    if (::getrandom(bytes, sizeof bytes, 0) != static_cast<ssize_t>(sizeof bytes))
+        throw Failure{.attempted = "make a password", .reason = std::strerror(errno)};
+    std::string password;
+    for (const unsigned char byte : bytes)
+        password += "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789+-"[byte % 64];
+    return password;
+}
+
+void PasswordChoice::Declare(Arguments &arguments)
+{
+    arguments.Flag("--empty-password", empty_, "no password: anybody can log in");
+    arguments.Flag("--unknown-password", unknown_, "one that nobody knows: nobody can log in until it is set");
+}
+
+std::string PasswordChoice::For(const std::string &name) const
+{
+    if (empty_ && unknown_)
+        throw UsageFailure("choose a password", "--empty-password and --unknown-password are two");
+    return empty_ ? std::string() : unknown_ ? UnknownPassword() : AskPassword(name);
+}
+
+}  // namespace tavoctl

@@ -1,0 +1,33 @@
+// Passwords: from a terminal or from standard input, never from the command line, where everybody sees them.
+#ifndef TAVOCTL_PASSWORD_H
+#define TAVOCTL_PASSWORD_H
+
+#include "frame/arguments.h"
+
+#include <string>
+
+namespace tavoctl {
+
+// The first line of standard input; at a terminal asked for twice, without being shown. Throws a Failure when there is
+// none or it is empty.
+std::string AskPassword(const std::string &name);
+
+// Thirty-two random characters.
+std::string UnknownPassword();
+
+// The options of a verb that gives accounts a password.
+class PasswordChoice {
+  public:
+    void Declare(Arguments &arguments);
+    std::string For(const std::string &name) const;
+    // Also without anybody who could be asked.
+    bool IsMade() const { return empty_ || unknown_; }
+
+  private:
+    bool empty_ = false;
+    bool unknown_ = false;
+};
+
+}  // namespace tavoctl
+
+#endif

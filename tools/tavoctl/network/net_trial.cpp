@@ -1,0 +1,246 @@
+// A change of the network on trial.
+#include "network/net_trial.h"
+
+#include "frame/failure.h"
+
+#include "tavo_proc.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <csignal>
+#include <cstdio>
+#include <ctime>
+#include <iostream>
+#include <utility>
+
+#include <fcntl.h>
+#include <poll.h>
+#include <sys/file.h>
+#include <sys/prctl.h>
+#include <sys/signalfd.h>
+#include <sys/socket.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace tavoctl {
+namespace {
+
+constexpr const char *pid_file = "/var/run/tavo-net-trial.pid";
+constexpr int longest_change = 90;  // seconds: an old DHCP client to be killed, a new one to get a lease
+
+enum Word : char { begun = 'b', keep = 'k', give_up = 'g', kept = 'K', put_back = 'P', failed = 'F' };
+
+std::int64_t Now()  // milliseconds, also while the machine sleeps
+{
+    timespec now = {};
+    ::clock_gettime(CLOCK_BOOTTIME, &now);
+    return std::int64_t{now.tv_sec} * 1000 + now.tv_nsec / 1000000;
+}
+
+int Left(std::int64_t until)
+{
+    return static_cast<int>(std::clamp<std::int64_t>(until - Now(), 0, 1000000));
+}
+
+bool Say(int socket, Word word)
+{
+    return ::send(socket, &word, 1, MSG_NOSIGNAL) == 1;
+}
+
+// 0 at the end of the line.
+char Hear(int socket)
+{
+    char word = 0;
+    return ::recv(socket, &word, 1, 0) == 1 ? word : '\0';
+}
+
+// Nothing of the terminal or the connection from which the command came; a name of its own, for whoever kills by name.
+int StandAlone()
+{
+    ::setsid();
+    ::prctl(PR_SET_NAME, "net-trial");
+    sigset_t signals;
+    ::sigemptyset(&signals);
+    for (const int number : {SIGUSR1, SIGTERM, SIGHUP, SIGINT})
+        ::sigaddset(&signals, number);
+    ::sigprocmask(SIG_BLOCK, &signals, nullptr);
+    const int null = ::open("/dev/null", O_RDWR | O_CLOEXEC);
+    for (int fd = 0; fd < 3; ++fd)
+        ::dup2(null, fd);
+    ::sigdelset(&signals, SIGHUP);
+    ::sigdelset(&signals, SIGINT);
+    return ::signalfd(-1, &signals, SFD_CLOEXEC);
+}
+
+// Whether somebody confirms in time.
+bool IsConfirmed(int command, int signals, int seconds)
+{
+    std::int64_t until = Now() + (seconds + longest_change) * 1000ll;
+    bool is_made = false;
+    pollfd ends[] = {{command, POLLIN, 0}, {signals, POLLIN, 0}};
+    for (;;) {
+        const int count = ::poll(ends, 2, Left(until));
+        if (count < 0 && errno == EINTR)
+            continue;
+        if (count <= 0)
+            return false;
+        if (ends[1].revents) {
+            signalfd_siginfo signal = {};
+            return ::read(signals, &signal, sizeof signal) == sizeof signal && signal.ssi_signo == SIGUSR1;
+        }
+        switch (Hear(command)) {
+        case keep:
+            return true;
+        case begun:
+            is_made = true;
+            until = Now() + seconds * 1000ll;
+            break;
+        case give_up:
+            return false;
+        default:
+            // The command is gone. What it has made may be confirmed by somebody else, half of it by nobody.
+            if (!is_made)
+                return false;
+            ends[0].fd = -1;
+        }
+    }
+}
+
+// From here on nobody can confirm any more; true when somebody just has.
+bool IsTooLate(int pid_fd, int signals)
+{
+    (void)!::ftruncate(pid_fd, 0);
+    pollfd end = {signals, POLLIN, 0};
+    signalfd_siginfo signal = {};
+    const bool confirmed = ::poll(&end, 1, 0) == 1 && ::read(signals, &signal, sizeof signal) == sizeof signal &&
+                           signal.ssi_signo == SIGUSR1;
+    return !confirmed;
+}
+
+[[noreturn]] void Guard(const NetSnapshot &before, int pid_fd, int command, int seconds)
+{
+    const int signals = StandAlone();
+    Say(command, begun);
+    bool done = true;
+    const bool confirmed = IsConfirmed(command, signals, seconds) || !IsTooLate(pid_fd, signals);
+    if (!confirmed) {
+        // A program that the killed command left, or somebody else, may hold the lock for a while.
+        const std::int64_t until = Now() + 2 * longest_change * 1000ll;
+        while (!(done = before.PutBack()) && Left(until) > 0)
+            ::sleep(1);
+    }
+    ::unlink(pid_file);
+    Say(command, confirmed ? kept : done ? put_back : failed);
+    ::_exit(0);
+}
+
+int OpenPidFile()
+{
+    const int fd = ::open(pid_file, O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0644);
+    if (fd < 0)
+        throw Failure{.attempted = std::string("write ") + pid_file, .reason = "it cannot be opened"};
+    struct stat held, named;
+    if (::flock(fd, LOCK_EX | LOCK_NB) == 0 && ::fstat(fd, &held) == 0 && ::stat(pid_file, &named) == 0 &&
+        held.st_ino == named.st_ino)
+        return fd;
+    ::close(fd);
+    throw Failure{.attempted = "try new settings",
+                  .reason = "others are on trial",
+                  .hint = "tavoctl net confirm keeps them; or wait until they are given up",
+                  .status = exit_busy};
+}
+
+void WritePid(int fd, pid_t pid)
+{
+    const std::string text = std::to_string(pid) + "\n";
+    if (::ftruncate(fd, 0) != 0 || ::pwrite(fd, text.data(), text.size(), 0) != static_cast<ssize_t>(text.size()))
+        throw Failure{.attempted = std::string("write ") + pid_file, .reason = "the disk is full"};
+}
+
+}  // namespace
+
+NetTrial::NetTrial(const std::string &interface, int seconds) : before_(interface), seconds_(seconds)
+{
+    const int pid_fd = OpenPidFile();
+    int line[2];
+    if (::socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, line) != 0)
+        throw Failure{.attempted = "try new settings", .reason = "no socket can be had"};
+    const pid_t pid = ::fork();
+    if (pid < 0)
+        throw Failure{.attempted = "try new settings", .reason = "no process can be started"};
+    if (pid == 0) {
+        ::close(line[0]);
+        try {
+            WritePid(pid_fd, ::getpid());
+        } catch (const Failure &) {
+            ::_exit(1);
+        }
+        Guard(before_, pid_fd, line[1], seconds);  // keeps the pid file locked
+    }
+    ::close(line[1]);
+    ::close(pid_fd);
+    guardian_ = line[0];
+    if (Hear(guardian_) != begun)
+        throw Failure{.attempted = "try new settings", .reason = "nobody would put the old ones back"};
+}
+
+NetTrial::~NetTrial()
+{
+    if (guardian_ >= 0)
+        ::close(guardian_);
+}
+
+void NetTrial::Begin()
+{
+    Say(guardian_, begun);
+}
+
+bool NetTrial::GiveUp()
+{
+    Say(guardian_, give_up);
+    return Hear(guardian_) == put_back;
+}
+
+bool NetTrial::IsKept()
+{
+    const bool terminal = ::isatty(STDIN_FILENO) && ::isatty(STDERR_FILENO);
+    const std::int64_t until = Now() + seconds_ * 1000ll;
+    if (terminal)
+        std::cerr << "Keep the new settings? The old ones come back in " << seconds_ << " s. [y/N] " << std::flush;
+    pollfd ends[] = {{guardian_, POLLIN, 0}, {terminal ? STDIN_FILENO : -1, POLLIN, 0}};
+    while (Left(until) > 0) {
+        if (::poll(ends, 2, Left(until)) <= 0)
+            continue;
+        if (ends[0].revents)
+            break;
+        std::string answer;
+        std::getline(std::cin, answer);
+        Say(guardian_, answer == "y" || answer == "Y" || answer == "yes" ? keep : give_up);
+        break;
+    }
+    const char verdict = Hear(guardian_);
+    if (terminal && verdict != kept)
+        std::cerr << "\n";
+    if (verdict == failed)
+        throw Failure{.attempted = "put the old settings back",
+                      .reason = "the library refuses",
+                      .hint = "tavoctl net show tells what is there now"};
+    return verdict == kept;
+}
+
+void NetTrial::Confirm()
+{
+    if (TLIBProcSignalByPidFile(pid_file, SIGUSR1) != 0)
+        throw Failure{.attempted = "keep the new settings",
+                      .reason = "none are on trial",
+                      .hint = "the old ones are back, or somebody has confirmed already",
+                      .status = exit_not_found};
+    for (int i = 0; i < 500; ++i) {
+        if (::access(pid_file, F_OK) != 0)
+            return;
+        ::usleep(10000);
+    }
+    throw Failure{.attempted = "keep the new settings", .reason = "they are just being put back"};
+}
+
+}  // namespace tavoctl

@@ -1,0 +1,111 @@
+// A service as it is at this moment.
+#include "service/service_state.h"
+
+#include "frame/containers.h"
+#include "frame/failure.h"
+#include "frame/host.h"
+#include "frame/processes.h"
+
+#include "tavo_file.h"
+#include "tavo_proc.h"
+#include "tavo_service.h"
+
+#include <algorithm>
+#include <fstream>
+#include <set>
+#include <sstream>
+
+#include <strings.h>
+
+namespace tavoctl {
+namespace {
+
+std::optional<bool> IsEnabled(const char *key)
+{
+    char value[8];
+    if (!key || TLIBFileGetKeyValue(settings_file, key, value, sizeof value, 0) <= 0)
+        return {};
+    if (::strcasecmp(value, "yes") == 0)
+        return true;
+    return ::strcasecmp(value, "no") == 0 ? std::optional(false) : std::nullopt;
+}
+
+void AddFolders(ServiceState &state)
+{
+    for (const int32_t *id = TAVOServiceShareIDGet(state.id); *id != TAVO_SERVICE_SHARE_END; ++id) {
+        TAVOSERVICESHARE share = {};
+        const bool there = TAVOServiceSettingGet(*id, &share) == 1;
+        state.bound = there && state.bound.value_or(true);
+        state.shares.emplace_back(share.szShareName);
+        const std::string volume = share.szVolumePath;
+        if (!volume.empty() && std::find(state.volumes.begin(), state.volumes.end(), volume) == state.volumes.end())
+            state.volumes.push_back(volume);
+    }
+}
+
+void AddProcess(ServiceState &state, const std::string &proc)
+{
+    if (proc.find('/') == std::string::npos)
+        state.pid = ProcessOf(proc);
+    else if (TLIBProcAliveByPidFile(proc.c_str()) == 1)
+        state.pid = TLIBReadPidFile(proc.c_str());
+    state.running = state.pid > 0;
+    if (state.pid > 0)
+        state.since = StartOf(state.pid);
+}
+
+}  // namespace
+
+int FindService(const std::string &name)
+{
+    const int id = TAVOServiceIndexGet(name.c_str());
+    if (id < 0)
+        throw Failure{.attempted = "find the service " + name,
+                      .reason = "there is none of that name",
+                      .hint = "tavoctl service list --all shows them",
+                      .status = exit_not_found};
+    return id;
+}
+
+ServiceState StateOf(int id, bool may_wait)
+{
+    ServiceState state;
+    state.id = id;
+    state.name = TAVOServiceNameGet(id);
+    const char *key = TAVOServiceKeyGet(id);
+    state.enabled = IsEnabled(key);
+    AddFolders(state);
+    // What has no process of its own runs when the library says that all it needs is there; what has nothing at all,
+    // such as the stack of database servers, cannot be told.
+    if (const char *proc = TAVOServiceProcGet(id))
+        AddProcess(state, proc);
+    else if (may_wait && (key || state.bound))
+        state.running = TAVOServiceStatusGet(id) == 1;
+    return state;
+}
+
+std::vector<std::string> ServiceNames()
+{
+    std::vector<std::string> names;
+    for (int id = 0; const char *name = TAVOServiceNameGet(id); ++id)
+        names.emplace_back(name);
+    return names;
+}
+
+std::vector<std::string> MountedVolumes()
+{
+    std::set<std::string> volumes;
+    std::ifstream mounts("/proc/mounts");
+    for (std::string line; std::getline(mounts, line);) {
+        std::string source;
+        std::string path;
+        std::istringstream(line) >> source >> path;
+        constexpr std::string_view stem = "/volume";
+        if (path.starts_with(stem) && path.size() > stem.size() &&
+            path.find_first_not_of("0123456789", stem.size()) == std::string::npos)
+            volumes.insert(path);
+    }
+    return {volumes.begin(), volumes.end()};
+}
+
+}  // namespace tavoctl

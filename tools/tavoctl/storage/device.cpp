@@ -1,0 +1,177 @@
+// Block devices: their names and their power state.
+#include "storage/device.h"
+
+#include "frame/containers.h"
+#include "frame/failure.h"
+
+#include "tavo_partition.h"
+
+#include <algorithm>
+#include <cctype>
+#include <cerrno>
+#include <cstdlib>
+#include <cstring>
+#include <fstream>
+#include <memory>
+
+#include <sys/stat.h>
+
+namespace tavoctl {
+namespace {
+
+constexpr std::string_view dev = "/dev/";
+
+struct FreeBlock {
+    void operator()(void *block) const { std::free(block); }
+};
+
+// Bays come before units and ports; sdb before sdaa.
+bool IsBefore(const std::string &left, const std::string &right)
+{
+    return left.size() != right.size() ? left.size() < right.size() : left < right;
+}
+
+std::vector<std::string> Names(const PARTITIONFILTER &filter)
+{
+    StringList paths;
+    if (PartitionPathEnum(&filter, paths.Address()) < 0)
+        return {};
+    std::vector<std::string> names;
+    for (const std::string &path : paths.Items())
+        names.push_back(DeviceName(path));
+    return names;
+}
+
+}  // namespace
+
+std::string DevicePath(const std::string &word)
+{
+    const std::string name = word.starts_with(dev) ? word.substr(dev.size()) : word;
+    const bool plain = !name.empty() && std::all_of(name.begin(), name.end(), [](unsigned char c) {
+        return std::isalnum(c) || c == '-' || c == '_';
+    });
+    if (!plain || name.front() == '-')
+        throw UsageFailure("use " + word, "it is no name of a device", "say it as sda3 or /dev/sda3");
+    return std::string(dev) + name;
+}
+
+std::string DeviceName(const std::string &path)
+{
+    return path.substr(path.rfind('/') + 1);
+}
+
+std::string DiskPath(const std::string &word)
+{
+    const std::string path = DevicePath(word);
+    DISKPATH parsed;
+    if (DiskPathParse(path.c_str(), &parsed) != 0 || parsed.nPartition != 0 ||
+        std::isdigit(static_cast<unsigned char>(path.back())))
+        throw UsageFailure("use " + word, "it is no name of a disk", "say it as sda or /dev/sda");
+    struct stat state;
+    if (::stat(path.c_str(), &state) != 0)
+        throw NotFound("use " + path, ERR_FILE_NOT_FOUND, "tavoctl disk list shows the disks");
+    return path;
+}
+
+std::vector<std::string> DiskPaths()
+{
+    int32_t *numbers = nullptr;
+    const int count = TAVODiskEnum(1, &numbers);
+    if (count < 0)
+        throw LibraryFailure("list the disks");
+    const std::unique_ptr<int32_t, FreeBlock> owner(numbers);
+    std::vector<std::string> paths;
+    for (int i = 0; i < count; ++i) {
+        TAVODISKINFO *info = nullptr;
+        if (TAVODiskGetInfo(1, numbers[i], &info) != 0)
+            continue;  // gone since
+        const std::unique_ptr<TAVODISKINFO, FreeBlock> summary(info);
+        if (std::string_view(info->szName).starts_with("sd"))
+            paths.push_back(std::string(dev) + info->szName);
+    }
+    std::sort(paths.begin(), paths.end(), IsBefore);
+    return paths;
+}
+
+std::vector<std::string> DiskNames()
+{
+    std::vector<std::string> names = Names({"sd", 0});
+    std::erase_if(names, [](const std::string &name) { return std::isdigit(static_cast<unsigned char>(name.back())); });
+    return names;
+}
+
+std::vector<std::string> DeviceNames()
+{
+    return Names({nullptr, 0});
+}
+
+std::string BayOf(const std::string &disk)
+{
+    int container = 0;
+    DISKPATH parsed;
+    if (DiskContainerGet(disk.c_str(), &container) != 0 || DiskPathParse(disk.c_str(), &parsed) != 0)
+        return "";
+    switch (container) {
+    case DISK_CONTAINER_INTERNAL:
+        return std::to_string(parsed.iDisk);
+    case DISK_CONTAINER_UNIT:
+        return std::to_string(parsed.iUnit) + "-" + std::to_string(parsed.iDisk);
+    case DISK_CONTAINER_ESATA:
+        return "esata";
+    default:
+        return "usb";
+    }
+}
+
+Power PowerOf(const std::string &disk)
+{
+    unsigned char state = 0;
+    if (TAVOIDiskCheckPower(disk.c_str(), &state) != 0)
+        return Power::unknown;
+    return state == 0 ? Power::standby : Power::spinning;
+}
+
+bool MayRead(const std::string &disk, bool wake)
+{
+    return wake || PowerOf(disk) == Power::spinning;
+}
+
+void RefuseToWake(const std::string &disk, bool wake, const std::string &attempted)
+{
+    const Power power = wake ? Power::spinning : PowerOf(disk);
+    if (power != Power::spinning)
+        throw Failure{.attempted = attempted,
+                      .reason =
+                          disk + (power == Power::standby ? " is in standby" : " does not tell whether it sleeps"),
+                      .hint = "say --wake to read it all the same",
+                      .status = exit_failed};
+}
+
+void RefuseToWakeAny(bool wake, const std::string &attempted)
+{
+    if (wake)
+        return;
+    for (const std::string &disk : DiskPaths()) {
+        if (PowerOf(disk) == Power::standby)
+            RefuseToWake(disk, false, attempted);
+    }
+}
+
+std::optional<std::string> KernelText(const std::string &path)
+{
+    std::ifstream file(path);
+    std::string line;
+    if (!std::getline(file, line))
+        return std::nullopt;
+    return line;
+}
+
+std::string Listed(const std::vector<std::string> &words)
+{
+    std::string text;
+    for (const std::string &word : words)
+        text += (text.empty() ? "" : ", ") + word;
+    return text;
+}
+
+}  // namespace tavoctl

@@ -1,0 +1,112 @@
+// Who uses a block device: a mount, swap, an array, a volume, or somebody who has it for himself.
+#include "frame/failure.h"
+#include "storage/device.h"
+
+#include "tavo_error.h"
+
+#include <cerrno>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <sys/sysmacros.h>
+#include <unistd.h>
+
+namespace tavoctl {
+namespace {
+
+namespace fs = std::filesystem;
+
+std::optional<dev_t> NumberOf(const std::string &path)
+{
+    struct stat state;
+    if (::stat(path.c_str(), &state) != 0 || !S_ISBLK(state.st_mode))
+        return std::nullopt;
+    return state.st_rdev;
+}
+
+// Two names may mean one device: /dev/vg1/lv and /dev/mapper/vg1-lv.
+std::string MountOf(dev_t number)
+{
+    for (const Mount &mount : Mounts()) {
+        if (NumberOf(mount.source) == number)
+            return " is mounted on " + mount.place;
+    }
+    std::ifstream swaps("/proc/swaps");
+    std::string line;
+    std::getline(swaps, line);  // the heading
+    while (std::getline(swaps, line)) {
+        if (NumberOf(line.substr(0, line.find_first_of(" \t"))) == number)
+            return " is swap space";
+    }
+    return "";
+}
+
+std::string HolderOf(const fs::path &device)
+{
+    std::error_code none;
+    for (const auto &holder : fs::directory_iterator(device / "holders", none)) {
+        const std::string name = holder.path().filename();
+        const auto mapped = KernelText(holder.path() / "dm/name");
+        return " belongs to " + (mapped ? "the volume " + *mapped : "/dev/" + name);
+    }
+    return "";
+}
+
+bool IsClaimed(const std::string &path)
+{
+    const int fd = ::open(path.c_str(), O_RDONLY | O_EXCL | O_NONBLOCK | O_CLOEXEC);
+    if (fd >= 0)
+        ::close(fd);
+    return fd < 0 && errno == EBUSY;
+}
+
+}  // namespace
+
+std::vector<Mount> Mounts()
+{
+    std::vector<Mount> mounts;
+    std::ifstream file("/proc/mounts");
+    for (std::string line; std::getline(file, line);) {
+        Mount mount;
+        std::istringstream words(line);
+        if (words >> mount.source >> mount.place)
+            mounts.push_back(mount);
+    }
+    return mounts;
+}
+
+std::string UseOf(const std::string &device)
+{
+    const auto number = NumberOf(device);
+    if (!number)
+        return "";
+    const fs::path place = "/sys/dev/block/" + std::to_string(major(*number)) + ":" + std::to_string(minor(*number));
+    for (const std::string &use : {MountOf(*number), HolderOf(place)}) {
+        if (!use.empty())
+            return device + use;
+    }
+    std::error_code none;
+    for (const auto &part : fs::directory_iterator(place, none)) {
+        if (!fs::exists(part.path() / "partition", none))
+            continue;
+        const std::string use = UseOf("/dev/" + part.path().filename().string());
+        if (!use.empty())
+            return use;
+    }
+    return IsClaimed(device) ? device + " is in use" : "";
+}
+
+void RefuseUsed(const std::vector<std::string> &devices, const std::string &attempted)
+{
+    for (const std::string &device : devices) {
+        if (!NumberOf(device))
+            throw NotFound(attempted + ": " + device, ERR_FILE_NOT_FOUND, "check the name");
+        if (const std::string use = UseOf(device); !use.empty())
+            throw Failure{.attempted = attempted, .reason = use, .hint = "free it first", .status = exit_busy};
+    }
+}
+
+}  // namespace tavoctl

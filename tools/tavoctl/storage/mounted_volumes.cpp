@@ -1,0 +1,66 @@
+// The volumes that are mounted.
+#include "storage/mounted_volumes.h"
+
+#include "frame/failure.h"
+
+#include <charconv>
+#include <cstdio>
+#include <map>
+#include <memory>
+
+#include <mntent.h>
+
+namespace tavoctl {
+namespace {
+
+constexpr std::string_view prefix = "/volume";
+
+// 0 for a path that is no volume's.
+int NumberOf(std::string_view path)
+{
+    int number = 0;
+    if (!path.starts_with(prefix))
+        return 0;
+    const auto [stop, error] = std::from_chars(path.data() + prefix.size(), path.data() + path.size(), number);
+    return error == std::errc() && stop == path.data() + path.size() ? number : 0;
+}
+
+struct EndMounts {
+    void operator()(std::FILE *mounts) const { ::endmntent(mounts); }
+};
+
+}  // namespace
+
+std::vector<MountedVolume> MountedVolumes()
+{
+    const std::unique_ptr<std::FILE, EndMounts> mounts(::setmntent("/proc/self/mounts", "re"));
+    if (!mounts)
+        throw Failure{.attempted = "list the mounted volumes", .reason = "/proc/self/mounts cannot be read"};
+    std::map<int, MountedVolume> found;
+    while (const mntent *mount = ::getmntent(mounts.get()))
+        if (const int number = NumberOf(mount->mnt_dir); number > 0)
+            found[number] = {number, mount->mnt_dir, mount->mnt_fsname};  // the last one lies on top
+    std::vector<MountedVolume> volumes;
+    for (auto &[number, volume] : found)
+        volumes.push_back(std::move(volume));
+    return volumes;
+}
+
+MountedVolume FindVolume(int number)
+{
+    for (const MountedVolume &volume : MountedVolumes())
+        if (volume.number == number)
+            return volume;
+    throw Failure{
+        .attempted = "find volume " + std::to_string(number), .reason = "it is not mounted", .status = exit_not_found};
+}
+
+MountedVolume FindVolume(const std::string &number)
+{
+    const int value = NumberOf(std::string(prefix) + number);
+    if (value <= 0)
+        throw UsageFailure("find volume " + number, "it is no number of a volume");
+    return FindVolume(value);
+}
+
+}  // namespace tavoctl
