@@ -127,8 +127,9 @@ TAVO_API int TAVOUserEnumBySubstr(TLIBSZLIST **ppList, int flags, const char *sz
 TAVO_API int TAVOUserTotalNum(int flags);
 
 /* How many more accounts may be created: "maxaccounts" of /etc.defaults/tavoinfo.conf less the accounts that exist; 0
- * when the key is there but empty. It may be negative when there are more than that; then it is below -1.
- * Returns -1 when the file or the key cannot be read. */
+ * when the key is there but empty. It is negative when there are more than that.
+ * Returns -1 with a code when the file or the key cannot be read; -1 also means one account too many, and then the code
+ * stays as it was. */
 TAVO_API int TAVOConfGetUserLimit(void);
 
 /* The application privilege bits of an account: 0x3F for "admin", 0 for "guest", 0x23 for a domain account; else as

@@ -32,6 +32,5 @@ extern "C" int TAVOConfGetUserLimit(void)
     const auto [stop, error] = std::from_chars(text, end, limit);
     if (error != std::errc() || stop != end || limit < 0)
         return Fail(ERR_FORMAT_ERROR);
-    // -1 is the failure: an appliance with one account more than it may have has no room for a second one either.
-    return limit - count == -1 ? -2 : limit - count;
+    return limit - count;
 }

@@ -300,7 +300,7 @@ TEST(UserLimit, MaxAccountsLessAccounts)
     } rows[] = {
         {"maxaccounts=\"12\"\nsupportguest=no\n", 11, 0},  // admin alone: the guest does not count without support
         {"maxaccounts=\"12\"\nsupportguest=yes\n", 10, 0}, {"maxaccounts=\nsupportguest=yes\n", 0, 0},
-        {"maxaccounts=\"1\"\nsupportguest=yes\n", -2, 0},  {"maxdisks=4\n", -1, ERR_KEY_NOT_FOUND},
+        {"maxaccounts=\"1\"\nsupportguest=yes\n", -1, 0},  {"maxdisks=4\n", -1, ERR_KEY_NOT_FOUND},
         {"maxaccounts=many\n", -1, ERR_FORMAT_ERROR},
     };
     for (const auto &row : rows) {

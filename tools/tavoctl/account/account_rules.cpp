@@ -52,9 +52,10 @@ void RefuseTakenId(const std::string &name, int uid)
 
 void RefuseTooMany(int additions, const std::string &attempted)
 {
-    constexpr int unknown = -1;  // the model names no limit
+    TLIBErrSet(ERR_SUCCESS);
     const int left = TAVOConfGetUserLimit();
-    if (left != unknown && left < additions)
+    const bool unknown = left == -1 && TLIBErrGet() != ERR_SUCCESS;  // the model names no limit
+    if (!unknown && left < additions)
         throw Failure{.attempted = attempted, .code = ERR_TOO_MANY_USERS};
 }
 
