@@ -250,6 +250,22 @@ TEST_F(TavoctlAccounts, NamesThatMislead)
     EXPECT_FALSE(PasswordIs("carla", ""));
 }
 
+TEST_F(TavoctlAccounts, TheModelsLimitHolds)
+{
+    // Four are there: as many as the model allows, and then one and two too many.
+    for (const char *most : {"4", "3", "2"}) {
+        WriteFile("/etc.defaults/tavoinfo.conf", "supportguest=yes\nmaxaccounts=" + std::string(most) + "\n");
+        EXPECT_THAT(Tavoctl({"user", "add", "--empty-password", "carla"}).err, HasSubstr("ERR_TOO_MANY_USERS")) << most;
+        EXPECT_THAT(Tavoctl({"user", "import", "-"}, "name,password\ncarla,x\n").err, HasSubstr("ERR_TOO_MANY_USERS"));
+    }
+    EXPECT_EQ(Line(passwd, "carla"), "");
+    for (const char *settings : {"supportguest=yes\nmaxaccounts=5\n", "supportguest=yes\n"}) {
+        WriteFile("/etc.defaults/tavoinfo.conf", settings);
+        ExpectDone({"user", "add", "--empty-password", "carla"});
+        ExpectDone({"user", "delete", "--yes", "carla"});
+    }
+}
+
 TEST_F(TavoctlAccounts, PasswordsAreTypedTwiceAndNeverShown)
 {
     if (test::RootLacks("pts"))
