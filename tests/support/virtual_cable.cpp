@@ -118,17 +118,21 @@ Node::~Node()
 
 void Node::Enter() const
 {
-    const std::string folder = "/proc/" + std::to_string(pid_) + "/ns/";
+    const std::string folder = "/proc/" + std::to_string(pid_);
     int fds[4];
-    const char *const names[] = {"net", "uts", "pid", "mnt"};
+    const char *const names[] = {"/ns/net", "/ns/uts", "/ns/pid", "/ns/mnt"};
     for (int i = 0; i < 4; ++i)
         fds[i] = ::open((folder + names[i]).c_str(), O_RDONLY | O_CLOEXEC);
+    const int root = ::open((folder + "/root").c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC);
     for (const int fd : fds) {
         if (::setns(fd, 0) != 0)
             ::_exit(125);
         ::close(fd);
     }
-    (void)!::chdir("/");
+    // Its mounts begin at the machine's root directory, and its own may be another.
+    if (::fchdir(root) != 0 || ::chroot(".") != 0)
+        ::_exit(125);
+    ::close(root);
     // In its process namespace are only the children.
     const pid_t pid = ::fork();
     if (pid != 0)

@@ -142,6 +142,7 @@ TEST(OutOfMemory, FailsTheRest)
     std::string name;
     FILE *stream = std::fopen((dir / "stream").c_str(), "we");
     std::setvbuf(stream, nullptr, _IONBF, 0);
+    const auto pairs = test::NewPairs();
     struct Row {
         const char *name;
         std::function<int()> call;
@@ -162,7 +163,7 @@ TEST(OutOfMemory, FailsTheRest)
          [&] { return TLIBIFileCheckFormat("%s                              =                      %s\n") + 1; },
          {ERR_OUT_OF_MEMORY, "file_check_format"}},
         {"Hash2File",
-         [&] { return ErrTLIBIFileHash2File(stream, "section", test::NewPairs().Get(), nullptr) + 1; },
+         [&] { return ErrTLIBIFileHash2File(stream, "section", pairs.Get(), nullptr) + 1; },
          {ERR_OUT_OF_MEMORY, "file_hash_2_file"}},
     };
     for (const Row &row : rows) {
