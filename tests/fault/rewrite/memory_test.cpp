@@ -142,7 +142,7 @@ TEST(OutOfMemory, FailsTheRest)
     std::string name;
     FILE *stream = std::fopen((dir / "stream").c_str(), "we");
     std::setvbuf(stream, nullptr, _IONBF, 0);
-    const auto pairs = test::NewPairs();
+    const test::StringHash &pairs = test::NewPairs();
     struct Row {
         const char *name;
         std::function<int()> call;

@@ -265,13 +265,13 @@ TEST_F(Net, AKilledTrialPutsTheOldSettingsBack)
             const std::string live = Live();
             bool same = true;
             for (int round = 0; round < rounds && same; ++round) {
-                std::optional<RunningTavoctl> trial(
-                    std::in_place, test::Words{"net", "set", "--try", "1", "192.0.2.20/25", "--gateway", "192.0.2.2"});
-                // Until it has begun, nothing is changed; from then on at any moment of the change and the wait.
-                Eventually([&] { return !TrialIsOver() && (round != 0 || Live() != live); });
-                ::usleep(static_cast<useconds_t>(random() % 600000));
-                ::kill(trial->Pid(), SIGKILL);
-                trial.reset();
+                {
+                    const RunningTavoctl trial({"net", "set", "--try", "1", "192.0.2.20/25", "--gateway", "192.0.2.2"});
+                    // Until it has begun, nothing is changed; from then on at any moment of the change and the wait.
+                    Eventually([&] { return !TrialIsOver() && (round != 0 || Live() != live); });
+                    ::usleep(static_cast<useconds_t>(random() % 600000));
+                    ::kill(trial.Pid(), SIGKILL);
+                }
                 same = Eventually(TrialIsOver) && IsAsBefore(live);
                 EXPECT_TRUE(same) << "round " << round;
             }
