@@ -12,17 +12,6 @@ namespace {
 // Programs read these lines with buffers of a fixed size.
 constexpr size_t kLongestField = 512;
 
-std::string WithNul(std::string_view line)
-{
-    return std::string(line).append(1, '\0');
-}
-
-bool HasIndex(const TAVOGROUPDB &db, int32_t gid, std::string_view key)
-{
-    std::string_view owner;
-    return Btree::Of(db.pGid)->Get(IdKey(gid), owner) == 0 && owner == key;
-}
-
 bool FitsInMembers(std::string_view name)
 {
     return name.size() <= kLongestField && FitsInField(name, true) && name.find(',') == name.npos && !IsDotName(name);
@@ -71,25 +60,12 @@ int ReadGroupLine(const TAVOGROUPDB &db, std::string_view key, GroupLine &line)
 
 int FindGroupKey(const TAVOGROUPDB &db, int32_t gid, std::string &key)
 {
-    std::string_view owner;
-    GroupLine line;
-    if (Btree::Of(db.pGid)->Get(IdKey(gid), owner) == 0 && ReadGroupLine(db, owner, line) == 0 && line.gid == gid) {
-        key = owner;
-        return 0;
-    }
-    // It may share its id with another group, which has the index entry, or have lost it with that one.
-    Btree &names = *Btree::Of(db.pName);
-    std::string_view name;
-    std::string_view value;
-    int code;
-    for (names.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = names.Step(true, name, value)) == 0;
-         names.nCursorType = TAVO_BDB_CURSOR_NEXT) {
-        if (ParseGroupLine(value, line) == 0 && line.gid == gid) {
-            key = name;
-            return 0;
-        }
-    }
-    return code == ERR_DB_END ? int{ERR_NO_SUCH_GROUP} : code;
+    const auto has_id = [](std::string_view text, int32_t id) {
+        GroupLine line;
+        return ParseGroupLine(text, line) == 0 && line.gid == id;
+    };
+    const int code = FindKeyById(*Btree::Of(db.pGid), *Btree::Of(db.pName), gid, has_id, key);
+    return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_GROUP} : code;
 }
 
 bool IsGroupDescription(std::string_view text)
@@ -142,7 +118,7 @@ int StoreGroup(const TAVOGROUPDB &db, const GroupChange &change)
 
 int RemoveGroup(const TAVOGROUPDB &db, const std::string &key, int32_t gid)
 {
-    const bool indexed = HasIndex(db, gid, key);
+    const bool indexed = HasIndex(*Btree::Of(db.pGid), gid, key);
     const int codes[] = {Btree::Of(db.pName)->Delete(key), Btree::Of(db.pDesc)->Delete(key),
                          indexed ? Btree::Of(db.pGid)->Delete(IdKey(gid)) : 0};
     for (const int code : codes)

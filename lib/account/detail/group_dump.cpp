@@ -2,12 +2,10 @@
 #include "account/detail/group_dump.h"
 
 #include "account/detail/account_name.h"
+#include "account/detail/family_dump.h"
 #include "account/detail/group_line.h"
 #include "account/detail/indexed_accounts.h"
 #include "account/detail/misc_line.h"
-#include "account/detail/text_commit.h"
-
-#include <sys/stat.h>
 
 namespace tavo {
 namespace {
@@ -52,17 +50,6 @@ int ComposeFiles(const TAVOGROUPDB &db, GroupDumpReport &report, std::string (&t
     return 0;
 }
 
-// A time that cannot be recorded costs a rebuild at the next open: the files are what counts, and they are in place.
-void RecordSyncTimes(const TAVOGROUPDB &db)
-{
-    TAVOBDB *const stores[] = {db.pName, db.pGid, db.pDesc};
-    for (size_t i = 0; i < kGroupStores; ++i) {
-        struct stat st = {};
-        ::lstat(kGroupStoreRows[i].text, &st);
-        Btree::Of(stores[i])->SetNumber(kSyncTimeKey, static_cast<int32_t>(st.st_mtime));
-    }
-}
-
 }  // namespace
 
 int DumpGroups(const TAVOGROUPDB &db, GroupDumpReport &report)
@@ -70,22 +57,8 @@ int DumpGroups(const TAVOGROUPDB &db, GroupDumpReport &report)
     std::string texts[kGroupTexts];
     if (const int code = ComposeFiles(db, report, texts))
         return code;
-    // A full /tmp must show before anything is decided.
-    for (TAVOBDB *store : {db.pName, db.pGid, db.pDesc})
-        if (const int code = Btree::Of(store)->Flush())
-            return code;
-    TextCommit commit(kGroupFamily);
-    for (size_t i = 0; i < kGroupTexts; ++i) {
-        const int code = commit.Write(i, texts[i]);
-        if (code == ERR_OPEN_FAILED)
-            report.not_opened = kGroupTextRows[i].temporary;
-        if (code != 0)
-            return code;
-    }
-    if (const int code = commit.Commit())
-        return code;
-    RecordSyncTimes(db);
-    return 0;
+    TAVOBDB *const stores[] = {db.pName, db.pGid, db.pDesc};
+    return DumpFamily(kGroupFamily, stores, texts, report.not_opened);
 }
 
 }  // namespace tavo

@@ -31,6 +31,32 @@ std::string IdKey(int32_t id)
     return {key, static_cast<size_t>(length) + 1};
 }
 
+bool HasIndex(Btree &index, int32_t id, std::string_view key)
+{
+    std::string_view owner;
+    return index.Get(IdKey(id), owner) == 0 && owner == key;
+}
+
+int FindKeyById(Btree &index, Btree &names, int32_t id, bool (*has_id)(std::string_view line, int32_t id),
+                std::string &key)
+{
+    std::string_view owner;
+    std::string_view line;
+    if (index.Get(IdKey(id), owner) == 0 && names.Get(owner, line) == 0 && has_id(line, id)) {
+        key = owner;
+        return 0;
+    }
+    int code;
+    for (names.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = names.Step(true, owner, line)) == 0;
+         names.nCursorType = TAVO_BDB_CURSOR_NEXT) {
+        if (has_id(line, id)) {
+            key = owner;
+            return 0;
+        }
+    }
+    return code == ERR_DB_END ? int{ERR_KEY_NOT_FOUND} : code;
+}
+
 int FindFreeId(Btree &index, const IdRange &range, int32_t &id)
 {
     int32_t current = 0;

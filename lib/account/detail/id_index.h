@@ -9,6 +9,14 @@ namespace tavo {
 // Six digits and a NUL, so that the order of the keys is the order of the ids.
 std::string IdKey(int32_t id);
 
+// Of accounts that share an id one has the index entry.
+bool HasIndex(Btree &index, int32_t id, std::string_view key);
+
+// The key of the account with that id, also of one that shares it with another or has lost its entry with that one. 0,
+// ERR_KEY_NOT_FOUND or a code of the stores.
+int FindKeyById(Btree &index, Btree &names, int32_t id, bool (*has_id)(std::string_view line, int32_t id),
+                std::string &key);
+
 struct IdRange {
     std::string_view current_key;  // where the last id handed out is kept
     int32_t first;

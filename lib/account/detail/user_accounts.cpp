@@ -13,11 +13,6 @@ namespace {
 
 constexpr std::string_view kLocked = "*";  // the hash of an account without a shadow line: nobody logs in with it
 
-std::string WithNul(std::string_view line)
-{
-    return std::string(line).append(1, '\0');
-}
-
 // An absent line leaves the record as it is.
 template <class Line>
 int ReadOptional(TAVOBDB *store, std::string_view key, int (*parse)(std::string_view, Line &), Line &line)
@@ -37,13 +32,6 @@ int DeleteEntry(TAVOBDB *store, std::string_view key)
 {
     const int code = Btree::Of(store)->Delete(key);
     return code == ERR_KEY_NOT_FOUND ? 0 : code;
-}
-
-// Of accounts that share an id one has the index entry.
-bool HasIndex(const TAVOUSERDB &db, int32_t uid, std::string_view key)
-{
-    std::string_view owner;
-    return Btree::Of(db.pUid)->Get(IdKey(uid), owner) == 0 && owner == key;
 }
 
 }  // namespace
@@ -87,25 +75,12 @@ int ReadUser(const TAVOUSERDB &db, std::string_view key, TAVOUSER **user)
 
 int FindUserKey(const TAVOUSERDB &db, int32_t uid, std::string &key)
 {
-    std::string_view owner;
-    PasswdLine line;
-    if (Btree::Of(db.pUid)->Get(IdKey(uid), owner) == 0 && ReadPasswdLine(db, owner, line) == 0 && line.uid == uid) {
-        key = owner;
-        return 0;
-    }
-    // It may share its id with another account, which has the index entry, or have lost it with that one.
-    Btree &names = *Btree::Of(db.pName);
-    std::string_view name;
-    std::string_view value;
-    int code;
-    for (names.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = names.Step(true, name, value)) == 0;
-         names.nCursorType = TAVO_BDB_CURSOR_NEXT) {
-        if (ParsePasswdLine(value, line) == 0 && line.uid == uid) {
-            key = name;
-            return 0;
-        }
-    }
-    return code == ERR_DB_END ? int{ERR_NO_SUCH_USER} : code;
+    const auto has_id = [](std::string_view text, int32_t id) {
+        PasswdLine line;
+        return ParsePasswdLine(text, line) == 0 && line.uid == id;
+    };
+    const int code = FindKeyById(*Btree::Of(db.pUid), *Btree::Of(db.pName), uid, has_id, key);
+    return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
 }
 
 int StoreUser(const TAVOUSERDB &db, const UserChange &change)
@@ -116,7 +91,7 @@ int StoreUser(const TAVOUSERDB &db, const UserChange &change)
         if (renamed && (code = DeleteEntry(store, change.old_key)) != 0)
             return code;
     if (!change.keep_index) {
-        if (!change.old_key.empty() && HasIndex(db, change.old_uid, change.old_key) &&
+        if (!change.old_key.empty() && HasIndex(*Btree::Of(db.pUid), change.old_uid, change.old_key) &&
             (code = DeleteEntry(db.pUid, IdKey(change.old_uid))) != 0)
             return code;
         std::string_view other;
@@ -139,7 +114,7 @@ int StoreUser(const TAVOUSERDB &db, const UserChange &change)
 
 int RemoveUser(const TAVOUSERDB &db, const std::string &key, int32_t uid)
 {
-    if (HasIndex(db, uid, key))
+    if (HasIndex(*Btree::Of(db.pUid), uid, key))
         if (const int code = DeleteEntry(db.pUid, IdKey(uid)))
             return code;
     for (TAVOBDB *store : {db.pName, db.pMisc, db.pShadow, db.pSmb})

@@ -2,12 +2,10 @@
 #include "account/detail/user_dump.h"
 
 #include "account/detail/account_name.h"
+#include "account/detail/family_dump.h"
 #include "account/detail/indexed_accounts.h"
 #include "account/detail/misc_line.h"
 #include "account/detail/passwd_line.h"
-#include "account/detail/text_commit.h"
-
-#include <sys/stat.h>
 
 namespace tavo {
 namespace {
@@ -73,17 +71,6 @@ int ComposeFiles(const TAVOUSERDB &db, DumpReport &report, std::string (&texts)[
     return 0;
 }
 
-// A time that cannot be recorded costs a rebuild at the next open: the files are what counts, and they are in place.
-void RecordSyncTimes(const TAVOUSERDB &db)
-{
-    TAVOBDB *const stores[] = {db.pName, db.pMisc, db.pShadow, db.pSmb, db.pUid};
-    for (size_t i = 0; i < kUserStores; ++i) {
-        struct stat st = {};
-        ::lstat(kUserStoreRows[i].text, &st);
-        Btree::Of(stores[i])->SetNumber(kSyncTimeKey, static_cast<int32_t>(st.st_mtime));
-    }
-}
-
 }  // namespace
 
 int DumpUsers(const TAVOUSERDB &db, DumpReport &report)
@@ -91,22 +78,8 @@ int DumpUsers(const TAVOUSERDB &db, DumpReport &report)
     std::string texts[kUserTexts];
     if (const int code = ComposeFiles(db, report, texts))
         return code;
-    // A full /tmp must show before anything is decided.
-    for (TAVOBDB *store : {db.pName, db.pMisc, db.pShadow, db.pSmb, db.pUid})
-        if (const int code = Btree::Of(store)->Flush())
-            return code;
-    TextCommit commit(kUserFamily);
-    for (size_t i = 0; i < kUserTexts; ++i) {
-        const int code = commit.Write(i, texts[i]);
-        if (code == ERR_OPEN_FAILED)
-            report.not_opened = kUserTextRows[i].temporary;
-        if (code != 0)
-            return code;
-    }
-    if (const int code = commit.Commit())
-        return code;
-    RecordSyncTimes(db);
-    return 0;
+    TAVOBDB *const stores[] = {db.pName, db.pMisc, db.pShadow, db.pSmb, db.pUid};
+    return DumpFamily(kUserFamily, stores, texts, report.not_opened);
 }
 
 }  // namespace tavo
