@@ -4,6 +4,7 @@
 #include "network/detail/interface_file.h"
 #include "network/detail/kernel_interface.h"
 #include "network/detail/net_command.h"
+#include "network/detail/route_change.h"
 #include "network/detail/route_table.h"
 
 #include <algorithm>
@@ -28,8 +29,7 @@ void RepairConnected(const std::vector<Route> &routes, const std::string &interf
                route.mask.Word() == found->mask.Word();
     });
     if (!present)
-        RunNetCommand("/sbin/route add -net %s netmask %s dev %s > /dev/null 2>&1", Ipv4::FromWord(network).Text(),
-                      found->mask.Text(), interface);
+        RunRouteTool("add", Ipv4Route{Ipv4::FromWord(network), found->mask}, interface.c_str());
 }
 
 }  // namespace

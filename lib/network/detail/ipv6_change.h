@@ -1,4 +1,4 @@
-// Changes of IPv6 addresses and routes: what all of them refuse, and the tool that makes them.
+// Changes of IPv6 addresses: what all of them refuse, and the tool that makes them.
 #ifndef TAVO_NETWORK_DETAIL_IPV6_CHANGE_H
 #define TAVO_NETWORK_DETAIL_IPV6_CHANGE_H
 
@@ -13,10 +13,6 @@ constexpr bool IsPrefixLength(int length) noexcept
 
 // "/sbin/ip -6 addr VERB ADDRESS/LENGTH dev INTERFACE"; its exit status, -1 when it was not run.
 int RunAddressTool(const char *verb, const in6_addr &address, int length, const char *interface);
-
-// "/sbin/ip -6 route VERB NETWORK/LENGTH [via GATEWAY] dev INTERFACE"; an empty gateway: the network is on the link.
-int RunRouteTool(const char *verb, const in6_addr &network, int length, const std::optional<in6_addr> &gateway,
-                 const char *interface);
 
 }  // namespace tavo
 

@@ -1,0 +1,38 @@
+// Routes that are added and removed: what is refused, and the tools that change them.
+#ifndef TAVO_NETWORK_DETAIL_ROUTE_CHANGE_H
+#define TAVO_NETWORK_DETAIL_ROUTE_CHANGE_H
+
+#include "network/detail/ipv4_text.h"
+#include "network/detail/ipv6_text.h"
+
+#include <optional>
+
+namespace tavo {
+
+struct Ipv4Route {
+    Ipv4 network;
+    Ipv4 mask;
+};
+
+struct Ipv6Route {
+    in6_addr network;
+    int length;
+    std::optional<in6_addr> gateway;  // none: the network is on the link
+};
+
+// Empty when a text is no address, the mask has holes or the network has bits behind it.
+std::optional<Ipv4Route> ParseRoute(const char *network, const char *mask) noexcept;
+std::optional<Ipv6Route> ParseRoute(const char *network, int length, const char *gateway) noexcept;
+
+// "/sbin/route VERB -net NETWORK netmask MASK dev INTERFACE"; its exit status, -1 when it was not run.
+int RunRouteTool(const char *verb, const Ipv4Route &route, const char *interface);
+// "/sbin/ip -6 route VERB NETWORK/LENGTH [via GATEWAY] dev INTERFACE".
+int RunRouteTool(const char *verb, const Ipv6Route &route, const char *interface);
+
+// The same under the network's lock: 0, ERR_LOCK_FAILED or ERR_OP_FAILURE.
+int ChangeRoute(const char *verb, const Ipv4Route &route, const char *interface);
+int ChangeRoute(const char *verb, const Ipv6Route &route, const char *interface);
+
+}  // namespace tavo
+
+#endif
