@@ -39,33 +39,32 @@ int AccountSession::OpenToRead(std::span<const size_t> stores)
     Unlock();
     if (const int code = Lock(kind_.lock, TAVO_LOCK_EXCLUSIVE))
         return code;
-    if (!system_.Take(kLockSeconds))
-        return ERR_LOCK_FAILED;
-    if (const int code = SealHolds(kind_.family) ? 0 : BuildStores(kind_))
-        return code;
+    const int code = OpenSettled(stores);
     system_.Release();
-    if (Open(stores) == 0 && IsCurrent())
-        return 0;
-    stores_.clear();
-    if (const int code = BuildStores(kind_))
-        return code;
-    return Open(stores);
+    return code;
 }
 
 int AccountSession::OpenToChange(unsigned locks)
 {
     if (const int code = Lock(locks, TAVO_LOCK_EXCLUSIVE))
         return code;
-    if (!system_.Take(kLockSeconds))
-        return ERR_LOCK_FAILED;
     std::vector<size_t> all(kind_.family.stores.size());
     std::iota(all.begin(), all.end(), size_t{0});
-    if (SealHolds(kind_.family) && Open(all) == 0 && IsCurrent())
+    return OpenSettled(all);
+}
+
+// While nobody who asks for the system's lock changes the text files.
+int AccountSession::OpenSettled(std::span<const size_t> stores)
+{
+    if (!system_.Take(kLockSeconds))
+        return ERR_LOCK_FAILED;
+    texts_ = StampTexts(kind_.family);
+    if (SealHolds(kind_.family) && Open(stores) == 0 && IsCurrent())
         return 0;
     stores_.clear();
-    if (const int code = BuildStores(kind_))
+    if (const int code = BuildStores(kind_, texts_))
         return code;
-    return Open(all);
+    return Open(stores);
 }
 
 void AccountSession::BeginChange()
@@ -73,7 +72,7 @@ void AccountSession::BeginChange()
     BreakSeal(kind_.family);
 }
 
-int AccountSession::Seal()
+int AccountSession::Seal(Texts texts)
 {
     int code = 0;
     for (const std::unique_ptr<Btree> &store : stores_)
@@ -82,7 +81,7 @@ int AccountSession::Seal()
                 code = failed;
     stores_.clear();
     if (code == 0)
-        WriteSeal(kind_.family);
+        WriteSeal(kind_.family, texts == Texts::kWritten ? StampTexts(kind_.family) : texts_);
     return code;
 }
 

@@ -9,6 +9,7 @@
 
 #include <memory>
 #include <span>
+#include <string>
 #include <vector>
 
 namespace tavo {
@@ -33,9 +34,12 @@ class AccountSession {
     // To be called before the first change of a store: from here to Seal, a death means that they are built anew.
     void BeginChange();
 
+    // What the end of a change leaves: files that were written from the stores, or, as nothing changed, those from before.
+    enum class Texts { kWritten, kAsBefore };
+
     // Closes the stores and seals them: they and the text files agree. ERR_DB_CLOSE when a store could not be written;
     // then it stays unsealed.
-    int Seal();
+    int Seal(Texts texts);
 
     // Gives the locks back; false when that failed. The destructor does the same.
     bool Unlock();
@@ -43,12 +47,14 @@ class AccountSession {
   private:
     int Lock(unsigned locks, unsigned mode);
     int Open(std::span<const size_t> stores);
+    int OpenSettled(std::span<const size_t> stores);
     bool IsCurrent() const;
 
     const AccountKind &kind_;
     unsigned locks_ = 0;
     SystemLock system_;
     std::vector<std::unique_ptr<Btree>> stores_;
+    std::string texts_;  // what the text files that the stores were built from looked like
 };
 
 }  // namespace tavo

@@ -223,7 +223,7 @@ int Btree::Close()
     if (db->close(db) != 0)
         return ERR_DB_CLOSE;
     if (sealed_)
-        WriteSeal(*FamilyOfStore(path_.c_str()));
+        WriteSeal(*FamilyOfStore(path_.c_str()), texts_);
     return 0;
 }
 
@@ -238,6 +238,8 @@ bool Btree::NoteChange()
     if (std::exchange(changed_, true))
         return true;
     const StoreFamily *family = FamilyOfStore(path_.c_str());
+    if (family)
+        texts_ = StampTexts(*family);
     sealed_ = family && SealHolds(*family);
     if (sealed_)
         BreakSeal(*family);

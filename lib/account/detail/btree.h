@@ -63,6 +63,7 @@ class Btree : public TAVOBDB {
     bool read_only_;
     bool changed_ = false;
     bool sealed_ = false;  // before our first change, the seal beside the store held for this file
+    std::string texts_;    // what the text files looked like then
 };
 
 // The stored bytes of the reserved keys.

@@ -26,7 +26,7 @@ inline int CommitGroups(AccountSession &session)
             LogError("%s:%d Failed to write the group files, tavoerr=0x%04X, errno=%d", code, errno);
         return code;
     }
-    if (session.Seal() != 0)
+    if (session.Seal(AccountSession::Texts::kWritten) != 0)
         LogError("%s:%d Failed to close the group stores, errno=%d", errno);
     return 0;
 }

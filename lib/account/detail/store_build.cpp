@@ -64,12 +64,13 @@ bool MoveIntoPlace(const std::string &built, const char *path)
 
 }  // namespace
 
-int BuildStores(const AccountKind &kind)
+int BuildStores(const AccountKind &kind, std::string &texts)
 {
     const StoreFamily &family = kind.family;
     BreakSeal(family);
     if (const int code = FinishCommit(family))
         return code;
+    texts = StampTexts(family);
     StoreContent content;
     if (!kind.read(content))
         return ERR_READ_FAILED;
@@ -85,7 +86,7 @@ int BuildStores(const AccountKind &kind)
     std::error_code ignored;
     fs::remove_all(family.build_dir, ignored);
     if (code == 0)
-        WriteSeal(family);
+        WriteSeal(family, texts);
     return code == ERR_NOT_ENOUGH_SPACE ? code : code == 0 ? 0 : ERR_OPEN_FAILED;
 }
 

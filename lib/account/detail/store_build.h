@@ -16,8 +16,9 @@ struct AccountKind {
 
 // Completes a half-done commit, reads the text files and puts new stores in place of the old ones, whatever those are;
 // old ones that were stores are kept as "NAME.bak". The locks must be held exclusively.
+// `texts` becomes what the text files looked like when they were read.
 // 0, ERR_OPEN_FAILED, ERR_READ_FAILED, ERR_NOT_ENOUGH_SPACE or ERR_RENAME_FAILED.
-int BuildStores(const AccountKind &kind);
+int BuildStores(const AccountKind &kind, std::string &texts);
 
 }  // namespace tavo
 

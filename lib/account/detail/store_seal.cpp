@@ -49,16 +49,13 @@ bool AddLine(std::string &text, const char *path, bool may_be_missing)
 }
 
 // What a seal that holds says; empty when the stores are incomplete.
-std::string SealText(const StoreFamily &family)
+std::string SealText(const StoreFamily &family, const std::string &texts)
 {
     std::string text = RunOfTheMachine();
     for (const StoreRow &store : family.stores)
         if (!AddLine(text, store.path, false))
             return {};
-    for (const TextRow &file : family.texts)
-        if (!AddLine(text, file.path, true))
-            return {};
-    return text;
+    return texts.empty() ? std::string() : text + texts;
 }
 
 }  // namespace
@@ -71,7 +68,7 @@ bool SealHolds(const StoreFamily &family)
         (st.st_uid != 0 && st.st_uid != ::geteuid()))
         return false;
     const std::string sealed = ReadSmall(fd);
-    return !sealed.empty() && sealed == SealText(family);
+    return !sealed.empty() && sealed == SealText(family, StampTexts(family));
 }
 
 void BreakSeal(const StoreFamily &family) noexcept
@@ -80,11 +77,22 @@ void BreakSeal(const StoreFamily &family) noexcept
         ::rmdir(family.seal);
 }
 
-void WriteSeal(const StoreFamily &family) noexcept
+std::string StampTexts(const StoreFamily &family) noexcept
+try {
+    std::string text;
+    for (const TextRow &file : family.texts)
+        if (!AddLine(text, file.path, true))
+            return {};
+    return text;
+} catch (const std::bad_alloc &) {
+    return {};
+}
+
+void WriteSeal(const StoreFamily &family, const std::string &texts) noexcept
 try {
     KeepErrno keep;
     BreakSeal(family);
-    const std::string text = SealText(family);
+    const std::string text = SealText(family, texts);
     if (text.empty())
         return;
     const Fd fd = OpenFd(family.seal, O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, 0644);

@@ -7,6 +7,8 @@
 
 #include "account/detail/store_family.h"
 
+#include <string>
+
 namespace tavo {
 
 // True when every store and text file is the very file, unchanged, that the seal knows, in this run of the machine.
@@ -14,8 +16,13 @@ bool SealHolds(const StoreFamily &family);
 
 void BreakSeal(const StoreFamily &family) noexcept;
 
-// Seals what there is. A seal that cannot be written costs a rebuild at the next open, nothing else.
-void WriteSeal(const StoreFamily &family) noexcept;
+// What the text files look like: to be taken before they are read. Empty, which no
+// seal is written for, when one of them is no plain file.
+std::string StampTexts(const StoreFamily &family) noexcept;
+
+// Seals the stores as they are, to text files that looked like `texts`: somebody may have exchanged one meanwhile, and
+// then this seal must not match. One that cannot be written costs a rebuild at the next open, nothing else.
+void WriteSeal(const StoreFamily &family, const std::string &texts) noexcept;
 
 // The family that a store file belongs to; nullptr for any other path.
 const StoreFamily *FamilyOfStore(const char *path) noexcept;

@@ -131,7 +131,8 @@ extern "C" int TAVOUserDelete(const char *const *rgszName, int nUser)
             if (TAVOUserDBDump(&db) != 0)
                 return -1;
         }
-        if (session.Seal() != 0)
+        using Texts = tavo::AccountSession::Texts;
+        if (session.Seal(doomed.empty() ? Texts::kAsBefore : Texts::kWritten) != 0)
             LogError("%s:%d Failed to close the account stores, errno=%d", errno);
         RemoveFromLists(doomed);
         if (!doomed.empty())

@@ -115,7 +115,8 @@ extern "C" int TAVOUserSet(const char *const *rgszOldName, const TAVOUSER *const
             LogError("%s:%d Failed to signal scheduled.");
         if (!batch.Done().empty() && TAVOUserDBDump(&db) != 0)
             return -1;
-        if (session.Seal() != 0)
+        using Texts = tavo::AccountSession::Texts;
+        if (session.Seal(batch.Done().empty() ? Texts::kAsBefore : Texts::kWritten) != 0)
             LogError("%s:%d Failed to close the account stores, errno=%d", errno);
         FollowUp(batch.Done());
         const bool unlocked = session.Unlock();

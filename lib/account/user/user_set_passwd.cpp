@@ -106,7 +106,8 @@ extern "C" int TAVOUserSetPasswd(const TAVOUSER *const *rgpUser, const char *con
         }
         if (changed && TAVOUserDBDump(&db) != 0)
             return -1;
-        if (session.Seal() != 0)
+        using Texts = tavo::AccountSession::Texts;
+        if (session.Seal(changed ? Texts::kWritten : Texts::kAsBefore) != 0)
             LogError("%s:%d Failed to close the account stores, errno=%d", errno);
         const bool unlocked = session.Unlock();
         TLIBScemdNotify(kAccountsChanged);
