@@ -1,0 +1,1 @@
+target_link_libraries(account_user_test PRIVATE crypt)
