@@ -7,6 +7,7 @@
 
 #include <sys/stat.h>
 #include <sys/wait.h>
+#include <unistd.h>
 
 namespace test {
 
@@ -42,6 +43,16 @@ std::string Told(const std::string &line)
 void Happen(const std::string &event)
 {
     Told("/usr/tavo/bin/appliance-event " + event);
+}
+
+bool Comes(const std::function<bool()> &condition)
+{
+    for (int i = 0; i < 1200; ++i) {
+        if (condition())
+            return true;
+        ::usleep(100'000);
+    }
+    return false;
 }
 
 }  // namespace test

@@ -5,6 +5,7 @@
 
 #include <gtest/gtest.h>
 
+#include <functional>
 #include <string>
 
 namespace test {
@@ -33,6 +34,9 @@ std::string Told(const std::string &line);
 
 // Something that happens from outside and has happened then, see appliance-event: "pull 2", "plug 2 --blank", "cut eth0".
 void Happen(const std::string &event);
+
+// Waits, generously, for what must come.
+bool Comes(const std::function<bool()> &condition);
 
 }  // namespace test
 

@@ -1,6 +1,7 @@
 // The files that the library writes, read by those who live on them: the C library, the login tools, Samba.
-#include "machine.h"
+#include "machine_users.h"
 
+#include "support/machine.h"
 #include "support/scratch_dir.h"
 
 #include "tavo_group.h"
@@ -65,12 +66,13 @@ std::string Hex(const unsigned char (&hash)[16])
     return text;
 }
 
-class MachineAccounts : public testing::Test {
+class MachineAccounts : public test::MachineTest {
   protected:
     void SetUp() override
     {
-        if (!test::IsMachine())
-            GTEST_SKIP() << "only the machine has these programs";
+        test::MachineTest::SetUp();
+        if (IsSkipped())
+            return;
         test::DeleteUsers({"anna", juergen, "next"});
         ASSERT_EQ(AddUser("anna", "secret one"), 0);
         ASSERT_EQ(AddUser(juergen, "gr\xC3\xBC\xC3\x9F", 24502), 0);
@@ -90,31 +92,31 @@ TEST_F(MachineAccounts, TheSystemsOwnToolsReadWhatTheLibraryWrites)
     ASSERT_EQ(TAVOGroupSet(nullptr, &group), 0);
 
     for (const char *name : {"anna", juergen}) {
-        EXPECT_EQ(Shell("getent passwd " + std::string(name)).text, LineOf("/etc/passwd", name) + "\n");
-        EXPECT_EQ(Shell("getent shadow " + std::string(name)).text, LineOf("/etc/shadow", name) + "\n");
+        EXPECT_EQ(Shell("getent passwd " + std::string(name)).output, LineOf("/etc/passwd", name) + "\n");
+        EXPECT_EQ(Shell("getent shadow " + std::string(name)).output, LineOf("/etc/shadow", name) + "\n");
     }
-    EXPECT_EQ(Shell("getent group staff").text, LineOf("/etc/group", "staff") + "\n");
-    EXPECT_THAT(Shell("id anna").text, HasSubstr("(staff)"));
-    EXPECT_THAT(Shell("chage -l " + std::string(juergen)).text, HasSubstr("Jan 31, 2037"));
-    EXPECT_THAT(Shell("chage -l anna").text, testing::ContainsRegex("Account expires[^\n]*never"));
+    EXPECT_EQ(Shell("getent group staff").output, LineOf("/etc/group", "staff") + "\n");
+    EXPECT_THAT(Shell("id anna").output, HasSubstr("(staff)"));
+    EXPECT_THAT(Shell("chage -l " + std::string(juergen)).output, HasSubstr("Jan 31, 2037"));
+    EXPECT_THAT(Shell("chage -l anna").output, testing::ContainsRegex("Account expires[^\n]*never"));
 
     // Somebody who is not root becomes anna with her password, and not with another.
     const std::string as_nobody = "setpriv --reuid 1023 --regid 1023 --clear-groups su anna -c 'id -un'";
-    EXPECT_THAT(Shell("echo 'secret one' | " + as_nobody).text, HasSubstr("anna\n"));
+    EXPECT_THAT(Shell("echo 'secret one' | " + as_nobody).output, HasSubstr("anna\n"));
     EXPECT_NE(Shell("echo 'secret two' | " + as_nobody).status, 0);
 }
 
 TEST_F(MachineAccounts, SambaReadsWhatTheLibraryWrites)
 {
-    const test::Output listed = Shell("pdbedit -s " + std::string(settings) + " -L -w");
-    EXPECT_EQ(listed.status, 0) << listed;
+    const test::CommandResult listed = Shell("pdbedit -s " + std::string(settings) + " -L -w");
+    EXPECT_EQ(listed.status, 0) << listed.output;
     for (const char *name : {"anna", juergen}) {
         std::string line = LineOf(samba_file, name);
         ASSERT_NE(line, "");
         line.replace(line.find(Field(line, 2)), 32, 32, 'X');  // it does not read LAN Manager hashes any more
-        EXPECT_THAT(listed.text, HasSubstr(line + "\n"));
+        EXPECT_THAT(listed.output, HasSubstr(line + "\n"));
     }
-    EXPECT_THAT(Shell("pdbedit -s " + std::string(settings) + " -L -v anna").text,
+    EXPECT_THAT(Shell("pdbedit -s " + std::string(settings) + " -L -v anna").output,
                 testing::AllOf(HasSubstr("Unix username:        anna"), HasSubstr("Account Flags:        [U ")));
 }
 
@@ -129,8 +131,8 @@ TEST_F(MachineAccounts, SambaHashesAsTheLibraryDoes)
                  {"anna", "x"}};
     for (const auto &[name, password] : cases) {
         const std::string typed = std::string("printf '%s\\n%s\\n' '") + password + "' '" + password + "'";
-        const test::Output set = Shell(typed + " | LC_ALL=C.UTF-8 smbpasswd -c " + settings + " -s " + name);
-        EXPECT_EQ(set.status, 0) << set;
+        const test::CommandResult set = Shell(typed + " | LC_ALL=C.UTF-8 smbpasswd -c " + settings + " -s " + name);
+        EXPECT_EQ(set.status, 0) << set.output;
         const std::string line = LineOf(samba_file, name);
         unsigned char hash[16];
         ASSERT_EQ(TLIBSmbMd4Hash(password, hash), 0);

@@ -1,5 +1,7 @@
 // Quotas as the kernel enforces them, on a real file system.
-#include "machine.h"
+#include "machine_users.h"
+
+#include "support/machine.h"
 
 #include "tavo_group.h"
 #include "tavo_quota.h"
@@ -78,23 +80,24 @@ Written WriteAs(int uid, const std::string &path, int64_t most)
     return written;
 }
 
-class MachineQuota : public testing::Test {
+class MachineQuota : public test::MachineTest {
   protected:
     void SetUp() override
     {
-        if (!test::IsMachine())
-            GTEST_SKIP() << "no disks here";
+        test::MachineTest::SetUp();
+        if (IsSkipped())
+            return;
         ASSERT_EQ(Shell("mkfs.ext4 -q -F " + std::string(device)).status, 0);
         ::mkdir("/volume1", 0755);
-        const test::Output mounted = Shell("mount " + std::string(device) + " /volume1 && chmod 1777 /volume1");
-        ASSERT_EQ(mounted.status, 0) << mounted;
+        const test::CommandResult mounted = Shell("mount " + std::string(device) + " /volume1 && chmod 1777 /volume1");
+        ASSERT_EQ(mounted.status, 0) << mounted.output;
         test::DeleteUsers({"anna", "berta"});
         ASSERT_EQ(AddUser("anna"), 0);
         ASSERT_EQ(AddUser("berta"), 0);
     }
     void TearDown() override
     {
-        if (test::IsMachine())
+        if (test::OnMachine())
             Shell("quotaoff /volume1; umount /volume1");
     }
 };
@@ -136,10 +139,10 @@ TEST_F(MachineQuota, LimitsAreSetEnforcedReportedAndClearedWithTheUser)
     EXPECT_GE(quota.cbUsed, static_cast<uint64_t>(4096 * kib));
 
     // The system's own tools and tavoctl say the same.
-    EXPECT_THAT(Shell("repquota -v /volume1").text, testing::ContainsRegex("anna +\\+?-- +[0-9]+ +1536 +1536|anna +"
-                                                                           "[+-]- +[0-9]+ +1536 +1536"));
-    EXPECT_THAT(Shell("tavoctl quota get anna 1 --json").text, HasSubstr("\"limit_kib\": 1536"));
-    EXPECT_THAT(Shell("tavoctl quota report").text, testing::ContainsRegex("1 +berta +- +[0-9]+"));
+    EXPECT_THAT(Shell("repquota -v /volume1").output, testing::ContainsRegex("anna +\\+?-- +[0-9]+ +1536 +1536|anna +"
+                                                                             "[+-]- +[0-9]+ +1536 +1536"));
+    EXPECT_THAT(Shell("tavoctl quota get anna 1 --json").output, HasSubstr("\"limit_kib\": 1536"));
+    EXPECT_THAT(Shell("tavoctl quota report").output, testing::ContainsRegex("1 +berta +- +[0-9]+"));
 
     // More room, then none that is counted.
     const float more = 3;
@@ -174,8 +177,8 @@ TEST_F(MachineQuota, LimitsOutliveSwitchingOffAndARemount)
     ASSERT_EQ(TAVOQuotaOff(1), 0);
     ASSERT_EQ(Shell("umount /volume1 && mount " + std::string(device) + " /volume1").status, 0);
     EXPECT_EQ(WriteAs(UserId("anna"), "/volume1/anna", 1024 * kib).error, 0);
-    const test::Output on = Shell("tavoctl quota on 1");
-    ASSERT_EQ(on.status, 0) << on;
+    const test::CommandResult on = Shell("tavoctl quota on 1");
+    ASSERT_EQ(on.status, 0) << on.output;
     TAVOQUOTA quota = {};
     ASSERT_EQ(TAVOQuotaGet("anna", device, &quota), 0);
     EXPECT_GE(quota.cbUsed, static_cast<uint64_t>(1024 * kib)) << "what was written meanwhile is counted";

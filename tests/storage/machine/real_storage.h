@@ -90,18 +90,6 @@ inline int Make(const Making &making)
     return RAIDCreate(&request);
 }
 
-// Waits, generously, for what must come.
-template <class Condition>
-bool Comes(Condition condition)
-{
-    for (int i = 0; i < 1200; ++i) {
-        if (condition())
-            return true;
-        ::usleep(100'000);
-    }
-    return false;
-}
-
 inline bool BecomesNormal(const std::string &path)
 {
     return Comes([&] {
