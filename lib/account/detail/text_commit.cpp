@@ -1,6 +1,7 @@
 // Replaces the text files of an account family together.
 #include "account/detail/text_commit.h"
 
+#include "account/detail/store_content.h"
 #include "core/detail/open_file.h"
 #include "tavo_error.h"
 
@@ -42,10 +43,19 @@ bool TakeOwnerAndMode(int fd, const TextRow &row)
     return ::fchown(fd, old.st_uid, old.st_gid) == 0 && ::fchmod(fd, old.st_mode & 07777) == 0;
 }
 
-bool SyncDirectories(const StoreFamily &family)
+bool IsAlready(const char *path, std::string_view text)
+{
+    struct stat st;
+    std::string old;
+    int64_t ignored = 0;
+    return ::lstat(path, &st) == 0 && S_ISREG(st.st_mode) && st.st_size == static_cast<off_t>(text.size()) &&
+           ReadTextFile(path, old, ignored) && old == text;
+}
+
+bool SyncDirectories(std::span<const TextRow> rows)
 {
     std::set<std::string> directories;
-    for (const TextRow &row : family.texts)
+    for (const TextRow &row : rows)
         directories.insert(std::filesystem::path(row.path).parent_path());
     for (const std::string &directory : directories) {
         const Fd fd = OpenFd(directory.c_str(), O_RDONLY | O_DIRECTORY);
@@ -67,14 +77,14 @@ std::string MarkerLine(const char *temporary)
     return std::string(temporary) + numbers;
 }
 
-bool WriteMarker(const StoreFamily &family)
+bool WriteMarker(const char *path, std::span<const TextRow> rows)
 {
     std::string text;
-    for (const TextRow &row : family.texts)
+    for (const TextRow &row : rows)
         text += MarkerLine(row.temporary);
     text += kEndOfMarker;
-    ::unlink(family.marker);
-    Fd fd = OpenFd(family.marker, O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
+    ::unlink(path);
+    Fd fd = OpenFd(path, O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
     return fd && WriteAll(fd.Get(), text) && SyncFd(fd.Get()) && fd.Close();
 }
 
@@ -102,6 +112,9 @@ TextCommit::~TextCommit()
 int TextCommit::Write(size_t index, std::string_view text)
 {
     const TextRow &row = family_.texts[index];
+    if (IsAlready(row.path, text))
+        return 0;
+    changed_.push_back(row);
     Fd fd = CreateTemporary(row.temporary);
     if (!fd)
         return ERR_OPEN_FAILED;
@@ -112,13 +125,25 @@ int TextCommit::Write(size_t index, std::string_view text)
 
 int TextCommit::Commit()
 {
-    if (!WriteMarker(family_) || !SyncDirectories(family_)) {
+    return changed_.empty() ? 0 : changed_.size() == 1 ? CommitOne() : CommitAll();
+}
+
+int TextCommit::CommitOne()
+{
+    if (::rename(changed_[0].temporary, changed_[0].path) != 0)
+        return ERR_RENAME_FAILED;
+    return SyncDirectories(changed_) ? 0 : WriteCode();
+}
+
+int TextCommit::CommitAll()
+{
+    if (!WriteMarker(family_.marker, changed_) || !SyncDirectories(changed_)) {
         const int code = WriteCode();
         ::unlink(family_.marker);
         return code;
     }
     bool moved = false;
-    for (const TextRow &row : family_.texts) {
+    for (const TextRow &row : changed_) {
         if (::rename(row.temporary, row.path) != 0) {
             keep_ = moved;
             if (!moved)
@@ -128,7 +153,7 @@ int TextCommit::Commit()
         moved = true;
     }
     keep_ = true;
-    SyncDirectories(family_);  // if not: the marker may outlive a power failure, and then this is done again
+    SyncDirectories(changed_);  // if not: the marker may outlive a power failure, and then this is done again
     ::unlink(family_.marker);
     return 0;
 }
@@ -143,7 +168,7 @@ int FinishCommit(const StoreFamily &family)
         if (!line.empty() && marker.find(line) != std::string::npos && ::rename(row.temporary, row.path) != 0)
             return ERR_RENAME_FAILED;
     }
-    SyncDirectories(family);
+    SyncDirectories(family.texts);
     ::unlink(family.marker);
     RemoveTemporaries(family);
     return 0;

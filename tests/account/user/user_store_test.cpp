@@ -1,5 +1,6 @@
 // The stores under /tmp are a cache: whatever happens to them, and to the text files behind the library's back, no
 // account is lost and nothing outside is touched.
+#include "tavo_group.h"
 #include "tavo_user.h"
 
 #include "account/user/user_fixture.h"
@@ -35,6 +36,11 @@ struct Fault {
     int reason = 0;
 } fault;
 
+// What somebody else does at the next rename of the library's.
+std::function<void()> meanwhile;
+
+int syncs = 0;  // how often the library waited for the disk
+
 bool Fails(const char *function)
 {
     if (!fault.function || std::strcmp(fault.function, function) != 0 || --fault.countdown != 0)
@@ -55,7 +61,14 @@ extern "C" {
 
 int fsync(int fd)
 {
+    ++syncs;
     return Fails("fsync") ? -1 : Next<int(int)>("fsync")(fd);
+}
+
+int fdatasync(int fd)
+{
+    ++syncs;
+    return Next<int(int)>("fdatasync")(fd);
 }
 
 ssize_t write(int fd, const void *bytes, size_t count)
@@ -65,6 +78,8 @@ ssize_t write(int fd, const void *bytes, size_t count)
 
 int rename(const char *from, const char *to)
 {
+    if (const auto act = std::exchange(meanwhile, nullptr))
+        act();
     return Fails("rename") ? -1 : Next<int(const char *, const char *)>("rename")(from, to);
 }
 
@@ -210,6 +225,29 @@ TEST(UserStore, EditsBehindTheLibrarysBack)
     EXPECT_EQ(test::LineOf("/etc/passwd", "extra"), "extra:x:1500:100::/HOME/extra:/bin/sh");
 }
 
+// The stores are being built from files that change meanwhile: what was read is given, once, and not taken for what the
+// files say now.
+TEST(UserStore, EditsWhileTheStoresAreBuilt)
+{
+    ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
+    for (const char *name : {"ext1", "ext2"}) {
+        ForgetStores();
+        meanwhile = [&] {
+            ExternalEdit("/etc/passwd", std::string(name) + ":x:901:100::/:/bin/sh");
+        };
+        EXPECT_FALSE(GetUser(name));
+        ASSERT_FALSE(meanwhile) << "nothing was built";
+        EXPECT_TRUE(GetUser(name));
+    }
+    // A program with a store of its own open, whose change keeps the stores sealed.
+    TAVOBDB *names = TAVOBDbOpen(TAVO_USER_DB_NAME, O_RDWR, 1);
+    ASSERT_TRUE(names);
+    EXPECT_EQ(TAVOBDbDomainExpireTimeSet(names), 0);
+    ExternalEdit("/etc/passwd", "ext3:x:902:100::/:/bin/sh");
+    EXPECT_EQ(TAVOBDbClose(names), 0);
+    EXPECT_TRUE(GetUser("ext3"));
+}
+
 // Accounts that share a user id, differ in case only, or have ids beyond the index survive every rewrite.
 TEST(UserStore, OddAccountsSurvive)
 {
@@ -348,6 +386,63 @@ TEST(UserStore, DisksThatFail)
         }
         EXPECT_GE(failed, std::strcmp(row.function, "fchown") == 0 ? 4 : 5) << row.function;
         ASSERT_EQ(test::DeleteUser("bob"), 0);
+    }
+}
+
+// How often a batch waits for the disk does not depend on its size.
+TEST(UserStore, SyncsOfABatch)
+{
+    std::vector<std::string> names;
+    for (int i = 0; i < 300; ++i)
+        names.push_back("user" + std::to_string(i));
+    const auto set = [&](bool add, const std::string &suffix) {
+        std::vector<test::User> users;
+        std::vector<const TAVOUSER *> records;
+        std::vector<const char *> old_names;
+        for (const std::string &name : names) {
+            users.push_back(test::MakeUser({.name = name + suffix, .password = "$1$ab$cd"}));
+            records.push_back(users.back().get());
+            old_names.push_back(add ? nullptr : name.c_str());
+        }
+        return TAVOUserSet(old_names.data(), records.data(), static_cast<int>(records.size()));
+    };
+    const auto remove = [&](const std::string &suffix) {
+        std::vector<std::string> full;
+        std::vector<const char *> doomed;
+        for (const std::string &name : names)
+            full.push_back(name + suffix);
+        for (const std::string &name : full)
+            doomed.push_back(name.c_str());
+        return TAVOUserDelete(doomed.data(), static_cast<int>(doomed.size()));
+    };
+    const auto join = [&] {
+        std::vector<const char *> members;
+        for (const std::string &name : names)
+            members.push_back(name.c_str());
+        members.push_back(nullptr);
+        TAVOGROUP group = {};
+        group.szName = const_cast<char *>("staff");
+        group.nGid = -1;
+        group.rgszMember = const_cast<char **>(members.data());
+        return TAVOGroupSet(nullptr, &group);
+    };
+    const struct {
+        const char *what;
+        std::function<int()> change;
+        int most;
+    } rows[] = {
+        {"add", [&] { return set(true, ""); }, 9},
+        {"a group of all", join, 2},
+        {"nothing new", [&] { return set(false, ""); }, 0},
+        {"rename, also in the group", [&] { return set(false, "r"); }, 11},
+        {"delete, also from the group", [&] { return remove("r"); }, 11},
+    };
+    for (const auto &[what, change, most] : rows) {
+        ASSERT_TRUE(GetUser("root"));
+        syncs = 0;
+        EXPECT_EQ(change(), 0) << what;
+        EXPECT_LE(syncs, most) << what;
+        EXPECT_GE(syncs, most / 2) << what << ": who did not wait does not know";
     }
 }
 
