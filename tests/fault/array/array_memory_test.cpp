@@ -5,8 +5,7 @@
 #include "support/captured_log.h"
 #include "support/captures.h"
 #include "support/device_tree.h"
-#include "support/failing_malloc.h"
-#include "support/fault_state.h"
+#include "support/out_of_memory.h"
 #include "support/recorded_calls.h"
 #include "support/scenario.h"
 
@@ -15,11 +14,12 @@
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
-#include <functional>
 
 #include <linux/fs.h>
 #include <linux/major.h>
 #include <linux/raid/md_u.h>
+
+using test::FailEachAllocation;
 
 namespace {
 
@@ -41,32 +41,6 @@ class ArrayMemory : public testing::Test {
             .Prints("  /dev/md2|vg1|lSQfeY-dso4-NzXN-Hbdv-wh1J-WThm-cNRXi7|2\n"
                     "  /dev/md3|vg1|lSQfeY-dso4-NzXN-Hbdv-wh1J-WThm-cNRXi7|2\n")
             .AnyTimes();
-    }
-
-    // Each allocation of the call fails once. The call gives its result, -1 for failure, and frees what it got.
-    void Check(const char *what, int success, const std::function<int()> &call)
-    {
-        SCOPED_TRACE(what);
-        test::EachAllocation faults;
-        bool refused = false;
-        bool done = false;
-        while (faults.Next()) {
-            test::ForgetFault();
-            faults.Arm();
-            const int result = call();
-            faults.Disarm();
-            if (result == -1) {
-                EXPECT_TRUE(faults.Fired());
-                EXPECT_TRUE(TLIBErrGet() == ERR_OUT_OF_MEMORY || TLIBErrGet() == ERR_NOT_ENOUGH_MEMORY) << TLIBErrGet();
-                refused = true;
-            } else if (!faults.Fired()) {
-                EXPECT_EQ(result, success);
-                done = true;
-            }
-            EXPECT_EQ(faults.LeftAllocated(), 0);
-        }
-        EXPECT_TRUE(refused);
-        EXPECT_TRUE(done);
     }
 
     test::DeviceTree tree_;
@@ -95,21 +69,21 @@ class ArrayMemory : public testing::Test {
 
 TEST_F(ArrayMemory, Arrays)
 {
-    Check("RAIDInfoGet", 1, [] {
+    FailEachAllocation("RAIDInfoGet", 1, [] {
         RAIDINFO *info = nullptr;
         const int result = RAIDInfoGet("/dev/md2", &info);
         EXPECT_EQ(info == nullptr, result != 1);
         RAIDInfoFree(info);
         return result;
     });
-    Check("RAIDInfoEnum", 1, [] {
+    FailEachAllocation("RAIDInfoEnum", 1, [] {
         RAIDLIST *list = nullptr;
         const int result = RAIDInfoEnum(&list);
         EXPECT_EQ(list == nullptr, result != 1);
         RAIDListFree(list);
         return result;
     });
-    Check("RAIDInfoDup", 0, [] {
+    FailEachAllocation("RAIDInfoDup", 0, [] {
         RAIDMEMBER members[] = {{"/dev/sda3", 1, &members[1]}, {"/dev/sdb3", 1, nullptr}};
         RAIDINFO info = {};
         info.pMembers = members;
@@ -117,7 +91,7 @@ TEST_F(ArrayMemory, Arrays)
         RAIDInfoFree(copy);
         return copy ? 0 : -1;
     });
-    Check("RAIDSBEnum", 2, [] {
+    FailEachAllocation("RAIDSBEnum", 2, [] {
         char first[] = "/dev/sda3";
         char second[] = "/dev/sdb3";
         char *items[] = {first, second};
@@ -133,7 +107,7 @@ TEST_F(ArrayMemory, Arrays)
         TLIBSzListFree(list);
         return result;
     });
-    Check("RAIDUUIDGet", 1, [] {
+    FailEachAllocation("RAIDUUIDGet", 1, [] {
         char uuid[64] = "";
         const int result = RAIDUUIDGet("/dev/md2", uuid, sizeof uuid);
         EXPECT_EQ(*uuid == 0, result != 1);
@@ -143,14 +117,14 @@ TEST_F(ArrayMemory, Arrays)
 
 TEST_F(ArrayMemory, Volumes)
 {
-    Check("LVMPvSBEnum", 2, [] {
+    FailEachAllocation("LVMPvSBEnum", 2, [] {
         LVMPVLIST *list = nullptr;
         const int result = LVMPvSBEnum(&list);
         EXPECT_EQ(list == nullptr, result != 2);
         LVMPvSBListFree(list);
         return result;
     });
-    Check("LVMVgSB2Info", 0, [] {
+    FailEachAllocation("LVMVgSB2Info", 0, [] {
         LVMVG group = {};
         std::strcpy(group.szVg, "/dev/vg1");
         std::strcpy(group.szUuid, "lSQfeY-dso4-NzXN-Hbdv-wh1J-WThm-cNRXi7");
@@ -163,7 +137,7 @@ TEST_F(ArrayMemory, Volumes)
         LVMVgInfoFree(info);
         return result;
     });
-    Check("LVMVgSBGet", 1, [] {
+    FailEachAllocation("LVMVgSBGet", 1, [] {
         LVMVG group = {};
         const int result = LVMVgSBGet("/dev/vg1", &group);
         EXPECT_EQ(*group.szUuid == 0, result != 1);

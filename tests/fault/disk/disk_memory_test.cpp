@@ -5,8 +5,7 @@
 
 #include "support/captured_log.h"
 #include "support/device_tree.h"
-#include "support/failing_malloc.h"
-#include "support/fault_state.h"
+#include "support/out_of_memory.h"
 #include "support/recorded_calls.h"
 
 #include <gtest/gtest.h>
@@ -14,9 +13,10 @@
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
-#include <functional>
 
 #include <linux/fs.h>
+
+using test::FailEachAllocation;
 
 namespace {
 
@@ -37,29 +37,6 @@ class Memory : public testing::Test {
         }
     }
 
-    // Each allocation of the call fails once. The call gives its result, -1 for failure, and frees what it got.
-    void Check(const char *what, int success, const std::function<int()> &call)
-    {
-        SCOPED_TRACE(what);
-        test::EachAllocation faults;
-        bool refused = false;
-        while (faults.Next()) {
-            test::ForgetFault();
-            faults.Arm();
-            const int result = call();
-            faults.Disarm();
-            if (result == -1) {
-                EXPECT_TRUE(faults.Fired());
-                EXPECT_TRUE(TLIBErrGet() == ERR_OUT_OF_MEMORY || TLIBErrGet() == ERR_NOT_ENOUGH_MEMORY) << TLIBErrGet();
-                refused = true;
-            } else if (!faults.Fired()) {
-                EXPECT_EQ(result, success);
-            }
-            EXPECT_EQ(faults.LeftAllocated(), 0);
-        }
-        EXPECT_TRUE(refused);
-    }
-
     test::DeviceTree tree_;
     test::RecordedCalls calls_{[](int, unsigned long request, void *argument) {
         const uint64_t bytes = 1 << 30;
@@ -72,7 +49,7 @@ class Memory : public testing::Test {
 
 TEST_F(Memory, Disks)
 {
-    Check("DiskListPush", 0, [] {
+    FailEachAllocation("DiskListPush", 0, [] {
         DISKINFO info;
         DISKLIST *list = nullptr;
         const int result = DiskListPush(&list, &info);
@@ -80,34 +57,34 @@ TEST_F(Memory, Disks)
         std::free(list);
         return result;
     });
-    Check("TAVODiskEnum", 1, [] {
+    FailEachAllocation("TAVODiskEnum", 1, [] {
         int32_t *numbers = nullptr;
         const int result = TAVODiskEnum(1, &numbers);
         EXPECT_EQ(numbers == nullptr, result != 1);
         std::free(numbers);
         return result;
     });
-    Check("TAVODiskGetInfo", 0, [] {
+    FailEachAllocation("TAVODiskGetInfo", 0, [] {
         TAVODISKINFO *info = nullptr;
         const int result = TAVODiskGetInfo(1, 2048, &info);
         EXPECT_EQ(info == nullptr, result != 0);
         std::free(info);
         return result;
     });
-    Check("TAVOEBoxInfoEnum", 1, [] {
+    FailEachAllocation("TAVOEBoxInfoEnum", 1, [] {
         TAVOEBOX *boxes = nullptr;
         const int result = TAVOEBoxInfoEnum(&boxes);
         EXPECT_EQ(boxes == nullptr, result != 1);
         std::free(boxes);
         return result;
     });
-    Check("DiskContainerGet", 0, [] {
+    FailEachAllocation("DiskContainerGet", 0, [] {
         int kind = 0;
         const int result = DiskContainerGet("/dev/sda", &kind);
         EXPECT_EQ(kind, result == 0 ? 1 : 0);
         return result;
     });
-    Check("PartitionPathEnum", 2, [] {
+    FailEachAllocation("PartitionPathEnum", 2, [] {
         TLIBSZLIST *list = PslTLIBSzListAlloc(512);
         if (!list)
             return -1;
