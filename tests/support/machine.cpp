@@ -1,9 +1,9 @@
 // The virtual appliance as tests see it.
 #include "support/machine.h"
 
+#include "support/appliance_root.h"
+
 #include <cstdio>
-#include <cstdlib>
-#include <string_view>
 
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -14,9 +14,8 @@ namespace test {
 bool OnMachine()
 {
     // A desk may have disks, too: these are told by the name of the root, not by theirs.
-    const char *form = std::getenv("TAVO_ROOT_FORM");
     struct stat facts;
-    return form && std::string_view(form) == "machine" && ::stat("/dev/sda", &facts) == 0 && S_ISBLK(facts.st_mode);
+    return RootForm() == "machine" && ::stat("/dev/sda", &facts) == 0 && S_ISBLK(facts.st_mode);
 }
 
 CommandResult Shell(const std::string &line)

@@ -2,16 +2,16 @@
 #ifndef TESTS_SUPPORT_ROUNDS_H
 #define TESTS_SUPPORT_ROUNDS_H
 
+#include "support/appliance_root.h"
+
 #include <cstdlib>
-#include <string_view>
 
 namespace test {
 
 // The virtual appliance, whose processor is emulated, has time for a part only.
 inline bool Emulated()
 {
-    const char *form = std::getenv("TAVO_ROOT_FORM");
-    return form && std::string_view(form) == "machine";
+    return RootForm() == "machine";
 }
 
 // All of them when TAVO_LONG_TESTS is in the environment; else an eighth, so that a run of everything stays short.

@@ -1,6 +1,7 @@
 // Appliances on one virtual cable.
 #include "support/virtual_cable.h"
 
+#include "support/appliance_root.h"
 #include "support/scratch_dir.h"
 
 #include <gtest/gtest.h>
@@ -8,8 +9,6 @@
 #include <cerrno>
 #include <csignal>
 #include <cstdio>
-#include <cstdlib>
-#include <cstring>
 #include <filesystem>
 
 #include <fcntl.h>
@@ -204,18 +203,10 @@ void VirtualCable::Plug(const Node &node, const std::string &card)
 
 std::string VirtualCable::Missing()
 {
-    const char *const lacks = std::getenv("TAVO_ROOT_LACKS");
-    const std::string all = "," + std::string(lacks ? lacks : "") + ",";
-    for (const char *part : {"net", "uts", "mount", "sys"}) {
-        if (all.find("," + std::string(part) + ",") != std::string::npos)
+    for (const char *part : {"net", "uts", "mount", "sys", "setns"}) {
+        if (RootLacks(part))
             return std::string("needs namespaces: ") + part;
     }
-#ifdef __arm__
-    // Under the emulator of single programs no process gets into another's namespaces; the virtual appliance has them.
-    const char *const form = std::getenv("TAVO_ROOT_FORM");
-    if (!form || std::strcmp(form, "machine") != 0)
-        return "namespaces cannot be entered under an emulator of single programs";
-#endif
     if (test::ShellStatus("ip link add probe0 type veth 2>/dev/null && ip link del probe0") != 0)
         return "this kernel makes no veth pairs here";
     return "";

@@ -16,6 +16,7 @@ for form in $forms; do
     probe sys '[ -d /sys/class/net/lo ]'
     probe uts 'hostname other && [ "$(hostname)" = other ]'
     probe net '[ "$(busybox ip -o link | wc -l)" = 1 ] && busybox ip addr add 192.0.2.1/24 dev lo'
+    probe setns 'busybox nsenter -m -t 1 true'
     probe mknod 'mknod /tmp/x b 8 0'
     probe uids 'touch /tmp/x && chown 1024:100 /tmp/x && [ "$(stat -c %u:%g /tmp/x)" = 1024:100 ]'
     probe pts '[ -c /dev/ptmx ]'

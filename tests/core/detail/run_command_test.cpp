@@ -2,6 +2,8 @@
 #include "core/detail/run_command.h"
 
 #include "core/detail/command_output.h"
+#include "support/descriptors.h"
+#include "support/own_child.h"
 #include "support/scratch_dir.h"
 
 #include <gtest/gtest.h>
@@ -17,6 +19,8 @@
 
 using tavo::CommandOutput;
 using tavo::RunCommand;
+using test::ChildAction;
+using test::OpenDescriptors;
 
 namespace {
 
@@ -36,33 +40,9 @@ int StatusOf(const std::string &command)
     return output.Status();
 }
 
-int OpenDescriptors()
-{
-    int count = 0;
-    for (int fd = 0; fd < 1024; ++fd)
-        count += ::fcntl(fd, F_GETFD) >= 0;
-    return count;
-}
-
 void OnChild(int)
 {
 }
-
-// The action of SIGCHLD for a scope.
-class ChildAction {
-  public:
-    ChildAction(void (*handler)(int), int flags)
-    {
-        struct sigaction action = {};
-        action.sa_handler = handler;
-        action.sa_flags = flags;
-        ::sigaction(SIGCHLD, &action, &saved_);
-    }
-    ~ChildAction() { ::sigaction(SIGCHLD, &saved_, nullptr); }
-
-  private:
-    struct sigaction saved_;
-};
 
 TEST(RunCommand, StatusWhateverTheCallerDoesWithItsChildren)
 {

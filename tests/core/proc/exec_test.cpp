@@ -2,9 +2,9 @@
 #include "tavo_lock.h"
 #include "tavo_proc.h"
 
-#include "own_child.h"
 #include "support/descriptors.h"
 #include "support/fault_state.h"
+#include "support/own_child.h"
 #include "support/scratch_dir.h"
 
 #include <gtest/gtest.h>

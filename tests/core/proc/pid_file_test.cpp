@@ -1,9 +1,10 @@
 // Pid files, and signals to the processes that they name.
 #include "tavo_proc.h"
 
-#include "own_child.h"
+#include "support/eventually.h"
 #include "support/failing_malloc.h"
 #include "support/fault_state.h"
+#include "support/own_child.h"
 #include "support/scratch_dir.h"
 
 #include <gtest/gtest.h>
@@ -117,10 +118,9 @@ TEST(PidFile, ForeignFilesSpeakForTheirOwnersProcesses)
     test::OwnChild gone([] {});
     const pid_t dead = gone.Pid();
     gone.Status();
+    const std::string proc = "/proc/" + std::to_string(theirs.Pid());
     struct stat st;
-    for (int i = 0; i < 1000 && (::stat(("/proc/" + std::to_string(theirs.Pid())).c_str(), &st) != 0 || st.st_uid == 0);
-         ++i)
-        ::usleep(1000);
+    ASSERT_TRUE(test::Eventually([&] { return ::stat(proc.c_str(), &st) == 0 && st.st_uid != 0; }));
 
     const test::ScratchDir dir;
     const std::string path = dir / "x.pid";

@@ -1,10 +1,12 @@
 // Finding processes, with a ps that knows -I and with one that does not.
 #include "tavo_proc.h"
 
-#include "own_child.h"
+#include "support/appliance_root.h"
 #include "support/descriptors.h"
+#include "support/eventually.h"
 #include "support/failing_malloc.h"
 #include "support/fault_state.h"
+#include "support/own_child.h"
 #include "support/scratch_dir.h"
 
 #include <gmock/gmock.h>
@@ -53,7 +55,7 @@ class Ps : public testing::Test {
   protected:
     void SetUp() override
     {
-        if (::access("/etc.defaults/tavoinfo.conf", F_OK) != 0)
+        if (test::RootForm().empty())
             GTEST_SKIP() << "only in an appliance root";
         SKIP_WITHOUT_PROC();
         test::WriteFile(dir_ / "ps", "#!/bin/sh\necho 'error: unsupported SysV option' >&2\nexit 1\n", 0755);
@@ -65,8 +67,7 @@ class Ps : public testing::Test {
         }
         for (const pid_t pid : pids_) {
             const std::string path = "/proc/" + std::to_string(pid) + "/cmdline";
-            for (int i = 0; i < 5000 && test::ReadFile(path).find("271828") == std::string::npos; ++i)
-                ::usleep(1000);
+            ASSERT_TRUE(test::Eventually([&] { return test::ReadFile(path).find("271828") != std::string::npos; }));
         }
     }
     void TearDown() override { other_ps = nullptr; }

@@ -1,9 +1,9 @@
 // Running programs for a limited time.
 #include "tavo_proc.h"
 
-#include "own_child.h"
 #include "support/captured_log.h"
 #include "support/fault_state.h"
+#include "support/own_child.h"
 #include "support/scratch_dir.h"
 
 #include <gtest/gtest.h>

@@ -3,6 +3,7 @@
 
 #include "tavo_file.h"
 
+#include "support/appliance_root.h"
 #include "support/captured_log.h"
 #include "support/failing_malloc.h"
 #include "support/fault_state.h"
@@ -11,7 +12,6 @@
 #include <gtest/gtest.h>
 
 #include <cerrno>
-#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <functional>
@@ -29,8 +29,7 @@ class Memory : public testing::Test {
   protected:
     void SetUp() override
     {
-        const char *lacks = std::getenv("TAVO_ROOT_LACKS");
-        if (!lacks || std::strstr(lacks, "mount"))
+        if (test::RootLacks("mount"))
             GTEST_SKIP() << "volumes cannot be mounted here";
         // Takes syslog's place and goes: lines are kept nowhere, or keeping them would be counted too.
         const test::CapturedLog silence;

@@ -1,6 +1,7 @@
 // Discovery: the packets and whom they are sent to, and the list of those who answered.
 #include "tavo_fhost.h"
 
+#include "network/named_process.h"
 #include "network/net/cards.h"
 
 #include <functional>
@@ -107,33 +108,8 @@ TEST_F(Discovery, TenCardsAreMoreThanAreAsked)
 }
 
 // A process that bears the daemon's name.
-class Daemon {
-  public:
-    Daemon()
-    {
-        int ends[2];
-        EXPECT_EQ(::pipe2(ends, O_CLOEXEC), 0);
-        pid_ = ::fork();
-        if (pid_ == 0) {
-            ::dup2(ends[0], 0);
-            ::execl("/bin/bash", "/usr/tavo/bin/findhostd", "-c", "read x; :", nullptr);
-            ::_exit(127);
-        }
-        ::close(ends[0]);
-        input_ = ends[1];
-        for (int i = 0; i < 1000 && !ReadFile("/proc/" + std::to_string(pid_) + "/cmdline").starts_with("/usr/tavo");
-             ++i)
-            ::usleep(10000);
-    }
-    ~Daemon()
-    {
-        ::close(input_);
-        ::waitpid(pid_, nullptr, 0);
-    }
-
-  private:
-    pid_t pid_ = -1;
-    int input_ = -1;
+struct Daemon : test::NamedProcess {
+    Daemon() : NamedProcess("/usr/tavo/bin/findhostd") {}
 };
 
 TEST_F(Discovery, WithoutADaemonNothingIsCollected)

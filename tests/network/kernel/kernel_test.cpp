@@ -1,6 +1,7 @@
 // The network's functions against a kernel: what they set is read back from it, in namespaces with cards of their own.
 #include "tavo_net.h"
 
+#include "network/card_record.h"
 #include "support/fault_state.h"
 #include "support/scenario.h"
 #include "support/scratch_dir.h"
@@ -17,6 +18,7 @@
 #include <sys/utsname.h>
 #include <unistd.h>
 
+using test::Card;
 using test::Node;
 using test::ReadFile;
 using test::VirtualCable;
@@ -52,16 +54,6 @@ class Kernel : public testing::Test {
             WriteFile(path, text);
             return true;
         }));
-    }
-
-    static TAVONETCARD Card(int mode, const char *address = "", const char *mask = "")
-    {
-        TAVONETCARD card = {};
-        card.nMode = mode;
-        std::strcpy(card.szInterface, "eth0");
-        std::strcpy(card.szIp, address);
-        std::strcpy(card.szMask, mask);
-        return card;
     }
 
     std::optional<VirtualCable> cable_;

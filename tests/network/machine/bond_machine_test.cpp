@@ -1,6 +1,7 @@
 // Bonds of the machine's two cards: made in each mode, cut off from a cable, dissolved, and interrupted at any moment.
 #include "tavo_net.h"
 
+#include "support/eventually.h"
 #include "support/machine.h"
 #include "support/rounds.h"
 #include "support/scratch_dir.h"
@@ -11,13 +12,13 @@
 #include <csignal>
 #include <cstring>
 #include <filesystem>
-#include <functional>
 #include <map>
 #include <random>
 
 #include <sys/wait.h>
 #include <unistd.h>
 
+using test::Eventually;
 using test::Happen;
 using test::ReadFile;
 using test::Told;
@@ -31,16 +32,6 @@ constexpr const char *kCalls = "/var/standin/rc.log";
 
 constexpr const char *kEth0 = "DEVICE=eth0\nONBOOT=yes\nBOOTPROTO=static\nIPADDR=192.0.2.10\nNETMASK=255.255.255.0\n";
 constexpr const char *kEth1 = "# uplink\nDEVICE=eth1\nBOOTPROTO=static\nIPADDR=198.51.100.10\nNETMASK=255.255.255.0\n";
-
-bool Eventually(const std::function<bool()> &condition)
-{
-    for (int i = 0; i < 1200; ++i) {
-        if (condition())
-            return true;
-        ::usleep(50000);
-    }
-    return false;
-}
 
 std::string Line(const std::string &path)
 {

@@ -2,6 +2,7 @@
 #include "tavo_net.h"
 
 #include "cards.h"
+#include "network/named_process.h"
 #include "support/hostile_names.h"
 #include "support/recorded_commands.h"
 
@@ -14,6 +15,7 @@
 using test::Cards;
 using test::CommandReply;
 using test::LastFault;
+using test::Quiet;
 using test::ReadFile;
 using test::WriteFile;
 using testing::ElementsAre;
@@ -25,11 +27,6 @@ using testing::MatchesRegex;
 namespace {
 
 constexpr const char *kTavoinfo = "/etc/tavoinfo.conf";
-
-std::string Quiet(const std::string &command)
-{
-    return command + " > /dev/null 2>&1";
-}
 
 // A card that knows wake-on-LAN.
 struct Wake {
@@ -269,26 +266,13 @@ TEST_F(NetIPv6, TheDhcpTestTellsThreeThings)
 // Programs that bear the DHCPv6 client's name, for one interface each.
 TEST_F(NetIPv6, ADhcp6ClientIsWaitedForOnItsOwnInterface)
 {
-    int ends[2];
-    ASSERT_EQ(::pipe2(ends, O_CLOEXEC), 0);
-    const pid_t pid = ::fork();
-    if (pid == 0) {
-        ::dup2(ends[0], 0);
-        ::execl("/bin/bash", "/usr/sbin/dhcp6c", "-c", "read x; :", "-f", "eth0", nullptr);
-        ::_exit(127);
-    }
-    ::close(ends[0]);
-    for (int i = 0; i < 1000 && !ReadFile("/proc/" + std::to_string(pid) + "/cmdline").starts_with("/usr/sbin/"); ++i)
-        ::usleep(10000);
-
+    test::NamedProcess client("/usr/sbin/dhcp6c", "eth0");
     EXPECT_EQ(TAVONetDhcp6Wait("eth0", 3), -1);
     EXPECT_EQ(LastFault(), (test::Fault{ERR_TIMER_EXPIRED, "net_dhcp6_wait"}));
     EXPECT_THAT(Sleeps(), ElementsAre("sleep 1", "sleep 1", "sleep 1"));
     calls_.Clear();
     EXPECT_EQ(TAVONetDhcp6Wait("eth", 3), 0);
-    ::close(ends[1]);
-    int status = 0;
-    ::waitpid(pid, &status, 0);
+    client.End();
     EXPECT_EQ(TAVONetDhcp6Wait("eth0", 3), 0);
     EXPECT_THAT(Sleeps(), IsEmpty());
     EXPECT_EQ(TAVONetDhcp6Wait("eth0", -1), -1);

@@ -2,6 +2,8 @@
 #include "tavo_net.h"
 
 #include "cards.h"
+#include "network/card_record.h"
+#include "network/named_process.h"
 #include "support/hostile_names.h"
 #include "support/recorded_commands.h"
 
@@ -14,9 +16,11 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+using test::Card;
 using test::Cards;
 using test::CommandReply;
 using test::LastFault;
+using test::Quiet;
 using test::ReadFile;
 using test::WriteFile;
 using testing::AllOf;
@@ -31,13 +35,6 @@ namespace {
 
 bool unkillable = false;
 std::string named_host;
-
-constexpr const char *kQuiet = " > /dev/null 2>&1";
-
-std::string Quiet(const std::string &command)
-{
-    return command + kQuiet;
-}
 
 class NetSettings : public Cards {
   protected:
@@ -55,16 +52,6 @@ class NetSettings : public Cards {
     {
         commands_.OnCommand(
             [=](const std::string &command) { return CommandReply{command.starts_with(beginning) ? status : 0}; });
-    }
-
-    static TAVONETCARD Card(int mode, const char *address = "", const char *mask = "")
-    {
-        TAVONETCARD card = {};
-        card.nMode = mode;
-        std::strcpy(card.szInterface, "eth0");
-        std::strcpy(card.szIp, address);
-        std::strcpy(card.szMask, mask);
-        return card;
     }
 
     const std::string kIfcfg = test::kScripts + "ifcfg-eth0";
@@ -156,53 +143,12 @@ TEST_F(NetSettings, WithoutALeaseTheOldAddressComesBack)
     std::filesystem::remove("/etc/dhcpc/dhcpcd-eth0.info");
 }
 
-// A process of ours under another program's name; ends with the test.
-class Client {
-  public:
-    explicit Client(const char *name)
-    {
-        int ends[2];
-        EXPECT_EQ(::pipe2(ends, O_CLOEXEC), 0);
-        pid_ = ::fork();
-        if (pid_ == 0) {
-            ::dup2(ends[0], 0);
-            ::execl("/bin/bash", name, "-c", "read x; :", nullptr);
-            ::_exit(127);
-        }
-        ::close(ends[0]);
-        input_ = ends[1];
-        const std::string line = "/proc/" + std::to_string(pid_) + "/cmdline";
-        for (int i = 0; i < 1000 && !ReadFile(line).starts_with(name); ++i)
-            ::usleep(10000);
-        WriteFile(kPidFile, std::to_string(pid_) + "\n");
-    }
-    ~Client()
-    {
-        ::close(input_);
-        if (!ended_)
-            End();
-        ::unlink(kPidFile);
-    }
-
-    // The signal that it died of, 0 for none.
-    int End()
-    {
-        ::close(input_);
-        input_ = -1;
-        int status = 0;
-        ::waitpid(pid_, &status, 0);
-        ended_ = true;
-        return WIFSIGNALED(status) ? WTERMSIG(status) : 0;
-    }
-
-    pid_t Pid() const { return pid_; }
+// A process under another program's name, where the DHCP client writes its number.
+struct Client : test::NamedProcess {
+    explicit Client(const char *name) : NamedProcess(name) { WriteFile(kPidFile, std::to_string(Pid()) + "\n"); }
+    ~Client() { ::unlink(kPidFile); }
 
     static constexpr const char *kPidFile = "/etc/dhcpc/dhcpcd-eth0.pid";
-
-  private:
-    pid_t pid_ = -1;
-    int input_ = -1;
-    bool ended_ = false;
 };
 
 TEST_F(NetSettings, ARunningClientIsKilledFirst)

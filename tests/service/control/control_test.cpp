@@ -106,7 +106,7 @@ TEST(NetService, DrivesDaemonsInItsOwnOrder)
                             "S25download.sh start", "S04crond.sh start", "S83nfsd.sh start", "S99mDNS.sh start"));
     EXPECT_TRUE(IsUp(21)) << "cron";
     EXPECT_EQ(TAVONetService(TAVO_DAEMON_CRON, TAVO_DAEMON_STOP), static_cast<int>(TAVO_DAEMON_CRON));
-    EXPECT_TRUE(test::Soon([] { return TAVOServiceStatusGet(21) == 0; }));
+    EXPECT_TRUE(test::Eventually([] { return TAVOServiceStatusGet(21) == 0; }));
     EXPECT_EQ(rgslckList[0].nRef, 0) << "no lock is left";
 
     // One that fails is left out of the answer, the others are driven all the same.
@@ -173,7 +173,8 @@ TEST(NetService, ReloadsBySignal)
     for (const char *daemon :
          {"httpd-user", "smbd", "nmbd", "afpd", "papd", "ftpd", "crond", "httpd-webdav", "dms", "iscsi_trgt"}) {
         const std::string log = std::string("/var/standin/") + daemon + ".log";
-        EXPECT_TRUE(test::Soon([&] { return test::ReadFile(log).find("signal 1\n") != std::string::npos; })) << daemon;
+        EXPECT_TRUE(test::Eventually([&] { return test::ReadFile(log).find("signal 1\n") != std::string::npos; }))
+            << daemon;
     }
     // The server reports itself running only while it is enabled.
     ASSERT_EQ(TLIBFileSetKeyValue("/etc/tavoinfo.conf", "runafp", "no", nullptr), 1);
@@ -654,7 +655,7 @@ TEST(ServiceSTDStatus, CountsAsEnabledUnlessItSaysNo)
         for (;;)
             ::pause();
     }
-    ASSERT_TRUE(test::Soon([] { return std::filesystem::exists("/tmp/held"); }));
+    ASSERT_TRUE(test::Eventually([] { return std::filesystem::exists("/tmp/held"); }));
     EXPECT_EQ(TAVOServiceStatusGet(18), 0);
     EXPECT_EQ(TLIBErrGet(), ERR_LOCK_FAILED);
     ::kill(holder, SIGKILL);

@@ -16,6 +16,7 @@
 #include <vector>
 
 using test::DaemonPid;
+using test::Eventually;
 using test::Fault;
 using test::HasEnded;
 using test::IsUp;
@@ -23,7 +24,6 @@ using test::LastFault;
 using test::LinkTarget;
 using test::ScriptCalls;
 using test::Setting;
-using test::Soon;
 using test::WriteFile;
 using testing::IsEmpty;
 using testing::MatchesRegex;
@@ -304,7 +304,7 @@ TEST_P(Keyed, EveryAction)
     EXPECT_EQ(Setting(key), "yes");
     EXPECT_EQ(ScriptCalls(), row.stop);
     ExpectStopped();
-    EXPECT_TRUE(Soon([&] { return TAVOServiceStatusGet(row.id) == row.on_when_stopped; }));
+    EXPECT_TRUE(Eventually([&] { return TAVOServiceStatusGet(row.id) == row.on_when_stopped; }));
     ExpectBound(true);
 
     EXPECT_EQ(Act(TAVO_SERVICE_START), 0);
@@ -350,7 +350,7 @@ TEST_P(Keyless, EveryAction)
             }
             continue;
         }
-        EXPECT_TRUE(Soon([&] { return TAVOServiceStatusGet(row.id) == 0; }));
+        EXPECT_TRUE(Eventually([&] { return TAVOServiceStatusGet(row.id) == 0; }));
         EXPECT_EQ(Act(start), 0);
         EXPECT_EQ(ScriptCalls(), row.start);
         ExpectRunning();

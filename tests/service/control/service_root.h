@@ -5,13 +5,14 @@
 #include "tavo_file.h"
 #include "tavo_service.h"
 
+#include "support/appliance_root.h"
 #include "support/captured_log.h"
+#include "support/eventually.h"
 
 #include <gtest/gtest.h>
 
 #include <cerrno>
 #include <csignal>
-#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
@@ -52,20 +53,9 @@ inline std::string Setting(const char *key)
 }
 
 // Daemons come and go a moment after their scripts have ended.
-template <class Condition>
-bool Soon(Condition condition)
-{
-    for (int tries = 0; tries < 1000; ++tries) {
-        if (condition())
-            return true;
-        ::usleep(10000);
-    }
-    return false;
-}
-
 inline bool IsUp(int service)
 {
-    return Soon([&] { return TAVOServiceStatusGet(service) == 1; });
+    return Eventually([&] { return TAVOServiceStatusGet(service) == 1; });
 }
 
 // The process of a stand-in, whatever its pid file says; 0 when it does not run.
@@ -78,12 +68,12 @@ inline pid_t DaemonPid(const std::string &name)
 
 inline bool Runs(const std::string &name)
 {
-    return Soon([&] { return DaemonPid(name) != 0; });
+    return Eventually([&] { return DaemonPid(name) != 0; });
 }
 
 inline bool HasEnded(const std::string &name)
 {
-    return Soon([&] { return DaemonPid(name) == 0; });
+    return Eventually([&] { return DaemonPid(name) == 0; });
 }
 
 inline std::string LinkTarget(const char *link)
@@ -112,8 +102,7 @@ class Services : public testing::Test {
   protected:
     void SetUp() override
     {
-        const char *lacks = std::getenv("TAVO_ROOT_LACKS");
-        if (!lacks || std::strstr(lacks, "mount"))
+        if (RootLacks("mount"))
             GTEST_SKIP() << "volumes cannot be mounted here";
         for (const char *volume : {"/volume1", "/volume2"}) {
             ::mkdir(volume, 0755);

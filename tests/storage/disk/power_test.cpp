@@ -1,6 +1,7 @@
 // What is sent to a drive, byte for byte and in which order.
 #include "tavo_disk.h"
 
+#include "support/appliance_root.h"
 #include "support/captured_log.h"
 #include "support/device_tree.h"
 #include "support/fault_state.h"
@@ -349,7 +350,7 @@ TEST_F(Drives, TimerBySeconds)
 
 TEST_F(Drives, TimerByMinutesIsSaved)
 {
-    if (!std::getenv("TAVO_ROOT_FORM"))
+    if (test::RootForm().empty())
         GTEST_SKIP() << "changes the system settings: only in an appliance root";
     test::WriteFile("/etc/tavoinfo.conf", "runsamba=\"yes\"\n");
     int minutes = 77;

@@ -88,7 +88,7 @@ TEST_F(MachineArrays, ALifeOfSixDisks)
     Told("mkfs.ext4 -q /dev/md2 && mount /dev/md2 /mnt && cp -r /bin/busybox /mnt/program && sync");
     const std::string sum = Told("md5sum /mnt/program");
     EXPECT_EQ(RAIDAddRobustCheck(ReadArray("/dev/md2").get(), "/dev/sdd3"), 0);
-    EXPECT_TRUE(test::Comes([] {
+    EXPECT_TRUE(test::Eventually([] {
         const Array read = ReadArray("/dev/md2");
         return read->fRebuilding || read->nStatus == RAID_STATUS_NORMAL;
     }));
@@ -100,21 +100,21 @@ TEST_F(MachineArrays, ALifeOfSixDisks)
     // One disk gone: degraded, and the data is there. Two: crashed.
     test::Happen("pull 2");
     Touch("/mnt/more");
-    EXPECT_TRUE(test::Comes([] { return StatusOf("/dev/md2") == RAID_STATUS_DEGRADED; }));
+    EXPECT_TRUE(test::Eventually([] { return StatusOf("/dev/md2") == RAID_STATUS_DEGRADED; }));
     EXPECT_EQ(MembersOf("/dev/md2", RAID_MEMBER_ACTIVE).size(), 3u);
     Told("echo 3 >/proc/sys/vm/drop_caches");
     EXPECT_EQ(Told("md5sum /mnt/program"), sum);
     EXPECT_EQ(RAIDRebuildingWait("/dev/md2"), -1);
     test::Happen("pull 3");
     Touch("/mnt/more");
-    EXPECT_TRUE(test::Comes([] { return StatusOf("/dev/md2") == RAID_STATUS_CRASHED; }));
+    EXPECT_TRUE(test::Eventually([] { return StatusOf("/dev/md2") == RAID_STATUS_CRASHED; }));
     Touch("/dev/md0");
-    EXPECT_TRUE(test::Comes([] { return StatusOf("/dev/md0") == RAID_STATUS_DEGRADED; }));
+    EXPECT_TRUE(test::Eventually([] { return StatusOf("/dev/md0") == RAID_STATUS_DEGRADED; }));
 
     // They come back. The crashed array is stopped first, and the others let go of the names.
     const std::string uuid = UuidOf("/dev/md2");
     Told("umount -l /mnt");
-    EXPECT_TRUE(test::Comes([] { return RAIDStop("/dev/md2") == 0; }));
+    EXPECT_TRUE(test::Eventually([] { return RAIDStop("/dev/md2") == 0; }));
     Touch("/dev/md1");
     for (const char *path : {"/dev/md0", "/dev/md1"})
         Told(std::string("mdadm -q ") + path + " --fail detached --remove detached");

@@ -2,6 +2,7 @@
 #ifndef TESTS_STORAGE_MACHINE_REAL_STORAGE_H
 #define TESTS_STORAGE_MACHINE_REAL_STORAGE_H
 
+#include "support/eventually.h"
 #include "support/machine.h"
 
 #include "tavo_disk.h"
@@ -92,7 +93,7 @@ inline int Make(const Making &making)
 
 inline bool BecomesNormal(const std::string &path)
 {
-    return Comes([&] {
+    return Eventually([&] {
         const Array array = ReadArray(path);
         return array && array->nStatus == RAID_STATUS_NORMAL && !array->fRebuilding;
     });

@@ -1,6 +1,7 @@
 // Layouts: recognised by their exact sectors, created and cleaned by exactly these commands.
 #include "tavo_partition.h"
 
+#include "support/appliance_root.h"
 #include "support/captured_log.h"
 #include "support/captures.h"
 #include "support/device_tree.h"
@@ -10,7 +11,6 @@
 
 #include <gmock/gmock.h>
 
-#include <cstdlib>
 #include <cstring>
 #include <map>
 
@@ -410,7 +410,7 @@ TEST_F(Partitions, HostileNamesRunNothing)
 // The real tool, on an image in the place of a disk.
 TEST(PartitionsOnAnImage, EveryLayoutIsRecognisedAfterItsCreation)
 {
-    if (!std::getenv("TAVO_ROOT_FORM") || std::strstr(std::getenv("TAVO_ROOT_LACKS"), "foreign-exec"))
+    if (test::RootLacks("foreign-exec"))
         GTEST_SKIP() << "writes to /dev/sda: only in an appliance root that runs the partitioning tool";
     const test::CapturedLog log;
     for (const TAVOPARTLAYOUT &layout : grgAllTavoPartLayout) {

@@ -4,6 +4,8 @@
 #include "tavo_fhost.h"
 #include "tavo_proc.h"
 
+#include "support/appliance_root.h"
+#include "support/eventually.h"
 #include "support/scratch_dir.h"
 #include "support/virtual_cable.h"
 
@@ -22,6 +24,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+using test::Eventually;
 using test::Node;
 using test::ReadFile;
 using test::ShellStatus;
@@ -38,16 +41,6 @@ constexpr const char *kDaemon = "/usr/tavo/bin/findhostd";
 constexpr const char *kPidFile = "/var/run/findhostd.pid";
 
 size_t awaited_lines = 0;  // the library sleeps until the list has so many, 20 seconds at most
-
-bool Eventually(const std::function<bool()> &condition)
-{
-    for (int i = 0; i < 2000; ++i) {
-        if (condition())
-            return true;
-        ::usleep(10000);
-    }
-    return false;
-}
 
 std::vector<std::string> Lines(const std::string &text)
 {
@@ -92,7 +85,7 @@ class Daemons : public testing::Test {
     {
         if (const std::string missing = VirtualCable::Missing(); !missing.empty())
             GTEST_SKIP() << missing;
-        if (const char *lacks = std::getenv("TAVO_ROOT_LACKS"); lacks && std::strstr(lacks, "uids"))
+        if (test::RootLacks("uids"))
             GTEST_SKIP() << "the daemon has nobody to become";
         cable_.emplace("cable");
         for (int i = 0; i < 3; ++i) {

@@ -1,11 +1,10 @@
 // The appliance's partitioning tool, run on image files.
+#include "support/appliance_root.h"
 #include "support/scratch_dir.h"
 
 #include <gmock/gmock.h>
 
 #include <cstdint>
-#include <cstdlib>
-#include <cstring>
 #include <string>
 #include <vector>
 
@@ -28,7 +27,7 @@ class Sfdisk : public testing::Test {
   protected:
     void SetUp() override
     {
-        if (!std::getenv("TAVO_ROOT_FORM") || std::strstr(std::getenv("TAVO_ROOT_LACKS"), "foreign-exec"))
+        if (test::RootLacks("foreign-exec"))
             GTEST_SKIP() << "runs /sbin/sfdisk: only in an appliance root that runs it";
         Resize(8 * kGiB);
     }

@@ -1,6 +1,7 @@
 // tavoctl lock run and proc: programs, their exit statuses, and who holds a lock meanwhile.
 #include "run_tavoctl.h"
 
+#include "support/eventually.h"
 #include "support/scratch_dir.h"
 
 #include "tavo_lock.h"
@@ -34,9 +35,7 @@ bool IsFree(unsigned lock)
 // Waits for a file that a program is about to make.
 void Await(const std::string &path)
 {
-    for (int i = 0; i < 500 && !std::filesystem::exists(path); ++i)
-        ::usleep(10'000);
-    ASSERT_TRUE(std::filesystem::exists(path)) << path;
+    ASSERT_TRUE(test::Eventually([&] { return std::filesystem::exists(path); })) << path;
 }
 
 TEST(TavoctlPrograms, LockRunGivesTheStatusOfItsProgram)

@@ -2,13 +2,14 @@
 #ifndef TESTS_TOOLS_TAVOCTL_RUN_TAVOCTL_H
 #define TESTS_TOOLS_TAVOCTL_RUN_TAVOCTL_H
 
+#include "support/appliance_root.h"
+
 #include <gtest/gtest.h>
 
 #include <csignal>
 #include <cstdlib>
 #include <ostream>
 #include <string>
-#include <string_view>
 #include <utility>
 #include <vector>
 
@@ -26,13 +27,6 @@ struct Ran {
     std::string out;
     std::string err;
 };
-
-// Whether the way in which the root was entered leaves this out.
-inline bool RootLacks(std::string_view what)
-{
-    const char *lacks = std::getenv("TAVO_ROOT_LACKS");
-    return lacks && ("," + std::string(lacks) + ",").find("," + std::string(what) + ",") != std::string::npos;
-}
 
 inline std::ostream &operator<<(std::ostream &out, const Ran &ran)
 {

@@ -1,6 +1,7 @@
 // tavoctl service: the table, the statuses and what the changing verbs leave behind, on stand-in daemons.
 #include "run_tavoctl.h"
 
+#include "support/eventually.h"
 #include "support/scratch_dir.h"
 
 #include "tavo_lock.h"
@@ -183,12 +184,9 @@ TEST_F(TavoctlService, ReloadSignalsOrSaysWhyNot)
     ASSERT_EQ(Tavoctl({"service", "enable", "--wait", "30", "web", "samba"}).status, 0);
     EXPECT_EQ(Tavoctl({"service", "reload", "web", "samba"}).status, 0);
     for (const char *daemon : {"httpd-user", "smbd", "nmbd"}) {
-        std::string log;
-        for (int i = 0; i < 500 && log.find("signal 1\n") == std::string::npos; ++i) {
-            ::usleep(10'000);
-            log = test::ReadFile(std::string("/var/standin/") + daemon + ".log");
-        }
-        EXPECT_THAT(log, HasSubstr("signal 1\n")) << daemon;
+        const std::string log = std::string("/var/standin/") + daemon + ".log";
+        EXPECT_TRUE(test::Eventually([&] { return test::ReadFile(log).find("signal 1\n") != std::string::npos; }))
+            << daemon;
     }
     EXPECT_EQ(Tavoctl({"service", "reload", "crond"}).status, 3) << "it does not run";
     const test::Ran photo = Tavoctl({"service", "reload", "photo"});

@@ -1,17 +1,18 @@
 // tavoctl net and discover on cards of a kernel: what they show, refuse and change, and what they put back.
 #include "tools/tavoctl/run_tavoctl.h"
 
+#include "support/eventually.h"
 #include "support/rounds.h"
 #include "support/scratch_dir.h"
 #include "support/virtual_cable.h"
 
 #include <gmock/gmock.h>
 
-#include <functional>
 #include <memory>
 #include <optional>
 #include <random>
 
+using test::Eventually;
 using test::Node;
 using test::Ran;
 using test::ReadFile;
@@ -27,16 +28,6 @@ namespace {
 constexpr const char *kIfcfg = "/etc/sysconfig/network-scripts/ifcfg-eth0";
 constexpr const char *kNetwork = "/etc/sysconfig/network";
 constexpr const char *kTrial = "/var/run/tavo-net-trial.pid";
-
-bool Eventually(const std::function<bool()> &condition)
-{
-    for (int i = 0; i < 6000; ++i) {
-        if (condition())
-            return true;
-        ::usleep(10000);
-    }
-    return false;
-}
 
 // As an administrator wrote them: with a comment, and not in the order of the library.
 constexpr const char *kOldFile = "# the rack\nIPADDR=192.0.2.10\nDEVICE=eth0\nNETMASK=255.255.255.0\nONBOOT=yes\n"

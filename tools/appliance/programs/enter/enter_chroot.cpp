@@ -16,7 +16,7 @@
 namespace enter {
 namespace {
 
-constexpr char lacking[] = "mount,pid,net,uts,ipc,proc,sys,pts,mknod,user";
+constexpr char lacking[] = "mount,pid,net,uts,ipc,proc,sys,pts,mknod,user,setns";
 
 void MakeDevices(const std::string &place)
 {

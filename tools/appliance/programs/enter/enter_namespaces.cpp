@@ -196,7 +196,7 @@ void FillPlace(const Request &request, const std::string &kept, const std::strin
         MakePlaceFor(request.emulator, inner);
         BindMount(request.emulator, inner, false);
         emulate = !own_users || !RegisterEmulator(place, request.emulator);
-        lacks += emulate ? ",foreign-exec" : "";
+        lacks += emulate ? ",setns,foreign-exec" : ",setns";  // the emulator has threads: it may not change its mounts
     }
     if (!own_users) {
         lacks += ",user";
