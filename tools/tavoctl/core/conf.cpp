@@ -12,8 +12,6 @@
 namespace tavoctl {
 namespace {
 
-constexpr char quoted_line[] = "%s=\"%s\"\n";
-
 // For completion: the keys of the system settings.
 std::vector<std::string> Keys()
 {
@@ -104,7 +102,48 @@ class ConfList : public Verb {
     SettingsFile file_;
 };
 
-class ConfSet : public Verb {
+// A verb that changes the lines of one key.
+class KeyChange : public Verb {
+  public:
+    void Declare(Arguments &arguments) override
+    {
+        arguments.Text("KEY", key_, "the name of the setting", Keys);
+        file_.DeclareSystem(arguments, true);
+    }
+
+    int Run(const Call &call) override
+    {
+        file_.Change(call, [&](const char *path) { Edit(path); });
+        return exit_done;
+    }
+
+  protected:
+    virtual void Edit(const char *path) = 0;
+
+    std::string key_;
+    SettingsFile file_;
+};
+
+// One that gives it a value.
+class ValueChange : public KeyChange {
+  protected:
+    void DeclareValue(Arguments &arguments, const char *help, Candidates keys)
+    {
+        arguments.Text("KEY", key_, "the name of the setting", keys);
+        arguments.Text("VALUE", value_, help);
+        file_.DeclareSystem(arguments, true);
+        arguments.Flag("--quote", quote_, "write the value in double quotes");
+    }
+
+    const char *Format() const { return quote_ ? "%s=\"%s\"\n" : nullptr; }
+
+    std::string value_;
+
+  private:
+    bool quote_ = false;
+};
+
+class ConfSet : public ValueChange {
   public:
     static constexpr VerbInfo info = {"set", changes | tells_before,
                                       "Sets KEY to VALUE. Its first line is replaced, later ones of the same key are "
@@ -114,110 +153,58 @@ class ConfSet : public Verb {
                                       "tavoctl conf set --file /etc/sysconfig/network --quote HOSTNAME nas\n"
                                       "tavoctl conf set offset -- -5"};
 
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("KEY", key_, "the name of the setting", Keys);
-        arguments.Text("VALUE", value_, "its new value");
-        file_.DeclareSystem(arguments, true);
-        arguments.Flag("--quote", quote_, "write the value in double quotes");
-    }
-
-    int Run(const Call &call) override
-    {
-        file_.Change(call, [&](const char *path) {
-            if (TLIBFileSetKeyValue(path, key_.c_str(), value_.c_str(), quote_ ? quoted_line : nullptr) != 1)
-                throw LibraryFailure("set " + key_ + " in " + file_.Path());
-        });
-        return exit_done;
-    }
+    void Declare(Arguments &arguments) override { DeclareValue(arguments, "its new value", Keys); }
 
   private:
-    std::string key_;
-    std::string value_;
-    SettingsFile file_;
-    bool quote_ = false;
+    void Edit(const char *path) override
+    {
+        if (TLIBFileSetKeyValue(path, key_.c_str(), value_.c_str(), Format()) != 1)
+            throw LibraryFailure("set " + key_ + " in " + file_.Path());
+    }
 };
 
-class ConfAppend : public Verb {
+class ConfAppend : public ValueChange {
   public:
     static constexpr VerbInfo info = {"append", changes | tells_before,
                                       "Appends KEY with VALUE. Fails when the key is there already.",
                                       "tavoctl conf append userHomeEnable yes"};
 
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("KEY", key_, "the name of the setting");
-        arguments.Text("VALUE", value_, "its value");
-        file_.DeclareSystem(arguments, true);
-        arguments.Flag("--quote", quote_, "write the value in double quotes");
-    }
-
-    int Run(const Call &call) override
-    {
-        file_.Change(call, [&](const char *path) {
-            if (TLIBFileAppendKey(path, key_.c_str(), value_.c_str(), quote_ ? quoted_line : nullptr) != 1)
-                throw LibraryFailure("append " + key_ + " to " + file_.Path());
-        });
-        return exit_done;
-    }
+    void Declare(Arguments &arguments) override { DeclareValue(arguments, "its value", nullptr); }
 
   private:
-    std::string key_;
-    std::string value_;
-    SettingsFile file_;
-    bool quote_ = false;
+    void Edit(const char *path) override
+    {
+        if (TLIBFileAppendKey(path, key_.c_str(), value_.c_str(), Format()) != 1)
+            throw LibraryFailure("append " + key_ + " to " + file_.Path());
+    }
 };
 
-class ConfRemove : public Verb {
+class ConfRemove : public KeyChange {
   public:
     static constexpr VerbInfo info = {"remove", changes | tells_before, "Removes every line of KEY.",
                                       "tavoctl conf remove userHomeEnable\n"
                                       "tavoctl conf remove --dry-run userHomeEnable"};
 
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("KEY", key_, "the name of the setting", Keys);
-        file_.DeclareSystem(arguments, true);
-    }
-
-    int Run(const Call &call) override
-    {
-        file_.Change(call, [&](const char *path) {
-            if (TLIBFileRemoveKey(path, key_.c_str()) != 1)
-                throw file_.Failed("remove " + key_ + " from " + file_.Path());
-        });
-        return exit_done;
-    }
-
   private:
-    std::string key_;
-    SettingsFile file_;
+    void Edit(const char *path) override
+    {
+        if (TLIBFileRemoveKey(path, key_.c_str()) != 1)
+            throw file_.Failed("remove " + key_ + " from " + file_.Path());
+    }
 };
 
-class ConfComment : public Verb {
+class ConfComment : public KeyChange {
   public:
     static constexpr VerbInfo info = {"comment", changes | tells_before,
                                       "Turns every line of KEY into a comment, with \";\" in front.",
                                       "tavoctl conf comment userHomeEnable"};
 
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("KEY", key_, "the name of the setting", Keys);
-        file_.DeclareSystem(arguments, true);
-    }
-
-    int Run(const Call &call) override
-    {
-        file_.Change(call, [&](const char *path) {
-            if (TLIBFileComment(path, key_.c_str()) != 1)
-                throw file_.Failed("comment out " + key_ + " in " + file_.Path());
-        });
-        return exit_done;
-    }
-
   private:
-    std::string key_;
-    SettingsFile file_;
+    void Edit(const char *path) override
+    {
+        if (TLIBFileComment(path, key_.c_str()) != 1)
+            throw file_.Failed("comment out " + key_ + " in " + file_.Path());
+    }
 };
 
 }  // namespace

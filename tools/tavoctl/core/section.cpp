@@ -32,6 +32,14 @@ std::string InFile(const std::string &verb, const std::string &section, Settings
     return verb + " section [" + section + "] of " + file.Path();
 }
 
+void SetAll(StringHash &settings, const std::vector<std::string> &pairs)
+{
+    for (const std::string &pair : pairs) {
+        const auto [key, value] = PairArgument(pair);
+        settings.Set(key, value);
+    }
+}
+
 constexpr char list_hint[] = "tavoctl section list shows what is there";
 
 class SectionList : public Verb {
@@ -152,10 +160,7 @@ class SectionSet : public Verb {
         StringHash settings;
         if (!replace_)
             Keep(settings);
-        for (const std::string &pair : pairs_) {
-            const auto [key, value] = PairArgument(pair);
-            settings.Set(key, value);
-        }
+        SetAll(settings, pairs_);
         const char *name = new_name_.empty() ? nullptr : new_name_.c_str();
         if (ErrTLIBFileSetSection(path, section_.c_str(), name, settings.Get(), 1, nullptr) != 1)
             throw file_.Failed(attempted);
@@ -231,10 +236,7 @@ class SectionAdd : public Verb {
         if (std::find(present.begin(), present.end(), section_) != present.end())
             throw Failure{.attempted = attempted, .code = ERR_SECTION_EXISTS};
         StringHash settings;
-        for (const std::string &pair : pairs_) {
-            const auto [key, value] = PairArgument(pair);
-            settings.Set(key, value);
-        }
+        SetAll(settings, pairs_);
         if (ErrTLIBFileAddSection(path, section_.c_str(), settings.Get(), nullptr) != 0)
             throw LibraryFailure(attempted);
     }

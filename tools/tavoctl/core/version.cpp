@@ -32,11 +32,6 @@ std::string VersionIn(const std::string &file)
     return mark == std::string::npos ? "" : file.substr(mark + 4);
 }
 
-Cell Known(const std::string &text)
-{
-    return text.empty() ? Cell() : Cell(text);
-}
-
 class Version : public Verb {
   public:
     static constexpr VerbInfo info = {"", reads,

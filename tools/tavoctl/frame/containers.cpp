@@ -17,6 +17,12 @@ StringList::StringList() : list_(PslTLIBSzListAlloc(first_size))
         throw std::bad_alloc();
 }
 
+StringList::StringList(const std::vector<std::string> &items) : StringList()
+{
+    for (const std::string &item : items)
+        Push(item);
+}
+
 void StringList::Push(const std::string &item)
 {
     if (TLIBSzListPush(&list_, item.c_str()) < 0)

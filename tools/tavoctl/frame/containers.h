@@ -15,6 +15,7 @@ namespace tavoctl {
 class StringList {
   public:
     StringList();
+    explicit StringList(const std::vector<std::string> &items);
     ~StringList() { TLIBSzListFree(list_); }
     StringList(const StringList &) = delete;
     StringList &operator=(const StringList &) = delete;

@@ -39,6 +39,12 @@ class Cell {
     std::variant<std::monostate, std::string, int64_t, bool, Bytes, std::vector<std::string>> value_;
 };
 
+// A text that is empty when it is not known.
+inline Cell Known(const std::string &text)
+{
+    return text.empty() ? Cell() : Cell(text);
+}
+
 class Table {
   public:
     // The columns by their JSON names; the heading is that name in capitals.

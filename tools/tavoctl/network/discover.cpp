@@ -5,11 +5,11 @@
 #include "frame/program.h"
 #include "frame/progress.h"
 #include "frame/table.h"
+#include "frame/watch.h"
 
 #include "tavo_fhost.h"
 #include "tavo_proc.h"
 
-#include <csignal>
 #include <cstdio>
 #include <iostream>
 #include <utility>
@@ -21,22 +21,7 @@ namespace {
 
 using Hosts = std::vector<std::pair<std::string, std::string>>;  // name and address
 
-constexpr const char *redraw = "\x1b[H\x1b[J";
 constexpr unsigned answer_seconds = 10;
-
-volatile std::sig_atomic_t asked_to_end = 0;
-
-// Sleeps of the library go on in spite of a signal's handler; a second one ends the program where it is.
-void EndOnRequest()
-{
-    struct sigaction action = {};
-    action.sa_handler = [](int) {
-        asked_to_end = 1;
-    };
-    action.sa_flags = static_cast<int>(SA_RESETHAND);
-    for (const int number : {SIGINT, SIGTERM})
-        ::sigaction(number, &action, nullptr);
-}
 
 std::string Interfaces(std::uint32_t mask)
 {
@@ -95,11 +80,7 @@ class Discover : public Verb {
                                       "tavoctl discover --json\n"
                                       "tavoctl discover --watch"};
 
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Flag("--watch", watch_,
-                       "again and again, until interrupted; in a pipe whenever something has changed");
-    }
+    void Declare(Arguments &arguments) override { arguments.Flag("--watch", watch_, watch_help); }
 
     int Run(const Call &call) override
     {
@@ -109,24 +90,7 @@ class Discover : public Verb {
             call.Print(Shown(Find()));
             return exit_done;
         }
-        EndOnRequest();
-        const bool terminal = ::isatty(STDOUT_FILENO) && !call.json;
-        bool first = true;
-        for (Hosts last; !asked_to_end;) {
-            Hosts hosts = Find();
-            if (asked_to_end)
-                break;
-            if (terminal)
-                std::cout << redraw;
-            else if (!first && hosts == last)
-                continue;
-            else if (!first && !call.json)
-                std::cout << "\n";
-            call.Print(Shown(hosts));
-            std::cout << std::flush;
-            last = std::move(hosts);
-            first = false;
-        }
+        Watch(call, 0, [] { return Shown(Find()); });
         return exit_done;
     }
 

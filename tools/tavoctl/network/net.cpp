@@ -28,12 +28,6 @@ std::vector<std::string> InterfaceNames()
 
 namespace {
 
-// "-" in a table for what is not there.
-Cell Known(const char *text)
-{
-    return *text ? Cell(text) : Cell();
-}
-
 std::vector<std::string> Ipv6Addresses(const char *interface)
 {
     StringList list;
@@ -120,9 +114,7 @@ class NetDns : public Verb {
         if (none_ != addresses_.empty())
             throw UsageFailure("set the name servers", none_ ? "there are some, and --none" : "none was named",
                                "name them in the order in which they are asked, or say --none");
-        StringList servers;
-        for (const std::string &address : addresses_)
-            servers.Push(address);
+        const StringList servers(addresses_);
         if (TAVONetDNSSet(servers.Get()) != 0)
             throw LibraryFailure("set the name servers", "a name server is an IPv4 or IPv6 address");
         return exit_done;

@@ -138,8 +138,7 @@ class NetBonds : public Verb {
                 table.Add({bond, Cell(), Members(bond), Cell()});  // a mode that is none of ours
                 continue;
             }
-            table.Add(
-                {bond, modes[record.nMode], Members(bond), record.szPartner[0] ? Cell(record.szPartner) : Cell()});
+            table.Add({bond, modes[record.nMode], Members(bond), Known(record.szPartner)});
         }
         call.Print(table);
         return exit_done;

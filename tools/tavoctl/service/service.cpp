@@ -7,22 +7,18 @@
 #include "frame/held_locks.h"
 #include "frame/program.h"
 #include "frame/table.h"
+#include "frame/watch.h"
 #include "service/service_state.h"
 
 #include "tavo_lock.h"
 #include "tavo_service.h"
 
 #include <algorithm>
-#include <csignal>
-#include <ctime>
-#include <iostream>
-
-#include <unistd.h>
 
 namespace tavoctl {
 namespace {
 
-constexpr char redraw[] = "\x1b[H\x1b[J";
+using tavoctl::Known;
 
 Cell Known(const std::optional<bool> &truth)
 {
@@ -32,11 +28,6 @@ Cell Known(const std::optional<bool> &truth)
 Cell Known(pid_t pid)
 {
     return pid > 0 ? Cell(int{pid}) : Cell();
-}
-
-Cell Known(const std::string &text)
-{
-    return text.empty() ? Cell() : Cell(text);
 }
 
 // The settings lock, so that every status of one table is of one moment and none of them waits on its own. Where somebody
@@ -58,27 +49,6 @@ class OneMoment {
     bool held_;
 };
 
-volatile std::sig_atomic_t asked_to_end = 0;
-
-// Sleeps, unless a signal asks to end.
-bool Wait(int seconds)
-{
-    timespec left = {seconds, 0};
-    while (!asked_to_end && ::nanosleep(&left, &left) != 0)
-        ;
-    return !asked_to_end;
-}
-
-void EndOnRequest()
-{
-    struct sigaction action = {};
-    action.sa_handler = [](int) {
-        asked_to_end = 1;
-    };
-    for (const int number : {SIGINT, SIGTERM})
-        ::sigaction(number, &action, nullptr);
-}
-
 class ServiceList : public Verb {
   public:
     static constexpr VerbInfo info = {
@@ -95,33 +65,16 @@ class ServiceList : public Verb {
     {
         arguments.Flag("--all", all_, "those too that this model has not");
         arguments.Option("--volume", "VOLUME", volume_, "only those with data on that volume", MountedVolumes);
-        arguments.Flag("--watch", watch_,
-                       "again and again, until interrupted; in a pipe whenever something has changed");
+        arguments.Flag("--watch", watch_, watch_help);
         arguments.Number("--interval", "SECONDS", interval_, "the time between two looks (2)", 1);
     }
 
     int Run(const Call &call) override
     {
-        if (!watch_) {
+        if (watch_)
+            Watch(call, interval_, [this] { return Look(); });
+        else
             call.Print(Look());
-            return exit_done;
-        }
-        EndOnRequest();
-        const bool terminal = ::isatty(STDOUT_FILENO) && !call.json;
-        std::string last;
-        do {
-            const Table table = Look();
-            std::string text = table.Text();
-            if (terminal)
-                std::cout << redraw;
-            else if (text == last)
-                continue;
-            else if (!last.empty() && !call.json)
-                std::cout << "\n";
-            call.Print(table);
-            std::cout << std::flush;
-            last = std::move(text);
-        } while (std::cout && Wait(interval_));
         return exit_done;
     }
 

@@ -258,7 +258,7 @@ class ServiceVolume : public Verb {
             TAVOServiceSettingGet(folder, &share);
             if (TAVOServiceShareGen(folder, volume.c_str(), path, sizeof path) < 0)
                 throw LibraryFailure("name the folder on " + volume);
-            table.Add({share.szLink, share.szVolume[0] ? Cell(share.szVolume) : Cell(), path});
+            table.Add({share.szLink, Known(share.szVolume), path});
         }
         call.Print(table);
         return exit_done;

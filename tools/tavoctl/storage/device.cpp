@@ -55,6 +55,14 @@ std::string DevicePath(const std::string &word)
     return std::string(dev) + name;
 }
 
+std::vector<std::string> DevicePaths(const std::vector<std::string> &words)
+{
+    std::vector<std::string> paths;
+    for (const std::string &word : words)
+        paths.push_back(DevicePath(word));
+    return paths;
+}
+
 std::string DeviceName(const std::string &path)
 {
     return path.substr(path.rfind('/') + 1);

@@ -13,6 +13,7 @@ namespace tavoctl {
 
 // "/dev/sda3" of "sda3" or "/dev/sda3"; throws a Failure for what is no plain name of a device.
 std::string DevicePath(const std::string &word);
+std::vector<std::string> DevicePaths(const std::vector<std::string> &words);
 std::string DeviceName(const std::string &path);  // "sda3"
 
 // The disk, whole, that a path names; throws a Failure when it is none, or not there.

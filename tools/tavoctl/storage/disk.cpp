@@ -6,6 +6,7 @@
 #include "storage/arrays.h"
 #include "storage/device.h"
 #include "storage/disk_power.h"
+#include "storage/disk_verb.h"
 #include "storage/smart.h"
 
 #include "tavo_lvm.h"
@@ -15,8 +16,6 @@
 
 namespace tavoctl {
 namespace {
-
-constexpr char wake_help[] = "read it although that wakes it";
 
 // What is known of a disk without waking it.
 struct DiskFacts {
@@ -87,18 +86,12 @@ class DiskList : public Verb {
     bool wake_ = false;
 };
 
-class DiskInfo : public Verb {
+class DiskInfo : public WakingVerb {
   public:
     static constexpr VerbInfo info = {
         "info", reads, "Shows what is known of a disk. One in standby is not read unless --wake is given.",
         "tavoctl disk info sda\n"
         "tavoctl disk info --wake --json /dev/sdb"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("DISK", disk_, "its name, sda or /dev/sda", DiskNames);
-        arguments.Flag("--wake", wake_, wake_help);
-    }
 
     int Run(const Call &call) override
     {
@@ -117,18 +110,13 @@ class DiskInfo : public Verb {
         record.Add("write_cache", asked ? Cell(TAVODiskWriteCacheGet(path.c_str()) == 1) : Cell());
         record.Add("layout", disk.layout);
         record.Add("role", ArraysOf(ReadArrays(), path));
-        const std::string use = UseOf(path);
-        record.Add("use", use.empty() ? Cell() : Cell(use));
+        record.Add("use", Known(UseOf(path)));
         call.Print(record);
         return exit_done;
     }
-
-  private:
-    std::string disk_;
-    bool wake_ = false;
 };
 
-class DiskSmart : public Verb {
+class DiskSmart : public WakingVerb {
   public:
     static constexpr VerbInfo info = {"smart", reads,
                                       "Lists the SMART attributes of a disk: the drive's own value counts down from "
@@ -136,12 +124,6 @@ class DiskSmart : public Verb {
                                       "drive expects to fail. A disk in standby is not read unless --wake is given.",
                                       "tavoctl disk smart sda\n"
                                       "tavoctl disk smart --wake --json sdb"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("DISK", disk_, "its name, sda or /dev/sda", DiskNames);
-        arguments.Flag("--wake", wake_, wake_help);
-    }
 
     int Run(const Call &call) override
     {
@@ -156,25 +138,15 @@ class DiskSmart : public Verb {
         call.Print(table);
         return exit_done;
     }
-
-  private:
-    std::string disk_;
-    bool wake_ = false;
 };
 
-class DiskTemperature : public Verb {
+class DiskTemperature : public WakingVerb {
   public:
     static constexpr VerbInfo info = {
         "temperature", reads,
         "Prints the temperature of a disk in degrees Celsius. A disk in standby is not read "
         "unless --wake is given.",
         "tavoctl disk temperature sda"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("DISK", disk_, "its name, sda or /dev/sda", DiskNames);
-        arguments.Flag("--wake", wake_, wake_help);
-    }
 
     int Run(const Call &call) override
     {
@@ -190,21 +162,12 @@ class DiskTemperature : public Verb {
         call.PrintValue(std::to_string(degrees), record);
         return exit_done;
     }
-
-  private:
-    std::string disk_;
-    bool wake_ = false;
 };
 
-class DiskWipeStatus : public Verb {
+class DiskWipeStatus : public DiskVerb {
   public:
     static constexpr VerbInfo info = {"wipe-status", reads, "Shows how far the wiping job of a disk has come.",
                                       "tavoctl disk wipe-status sda"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("DISK", disk_, "its name, sda or /dev/sda", DiskNames);
-    }
 
     int Run(const Call &call) override
     {
@@ -226,9 +189,6 @@ class DiskWipeStatus : public Verb {
         call.Print(record);
         return exit_done;
     }
-
-  private:
-    std::string disk_;
 };
 
 }  // namespace

@@ -3,7 +3,7 @@
 
 #include "frame/failure.h"
 #include "frame/program.h"
-#include "storage/device.h"
+#include "storage/disk_verb.h"
 
 #include "tavo_disk.h"
 
@@ -26,7 +26,7 @@ class DiskStandby : public Verb {
 
     void Declare(Arguments &arguments) override
     {
-        arguments.Texts("DISK", disks_, "its name, sda or /dev/sda", 0, DiskNames);
+        arguments.Texts("DISK", disks_, disk_help, 0, DiskNames);
         arguments.Flag("--all", all_, "all disks");
         arguments.Option("--timer", "MINUTES", minutes_, "set the spin-down timer of all disks instead");
     }
@@ -80,7 +80,7 @@ class DiskStandby : public Verb {
     std::string minutes_;
 };
 
-class DiskCache : public Verb {
+class DiskCache : public DiskVerb {
   public:
     static constexpr VerbInfo info = {"cache", changes,
                                       "Switches the write cache of a drive. With it a power failure loses what the "
@@ -90,7 +90,7 @@ class DiskCache : public Verb {
 
     void Declare(Arguments &arguments) override
     {
-        arguments.Text("DISK", disk_, "its name, sda or /dev/sda", DiskNames);
+        DiskVerb::Declare(arguments);
         arguments.Text("STATE", state_, "on or off", [] { return std::vector<std::string>{"on", "off"}; });
     }
 
@@ -109,7 +109,6 @@ class DiskCache : public Verb {
     }
 
   private:
-    std::string disk_;
     std::string state_;
 };
 

@@ -107,13 +107,11 @@ class LvmList : public Verb {
         for (const LVMPV &pv : PhysicalVolumes()) {
             char path[256];
             const bool has = *pv.szVg && LVMGetLVPath(pv.szPv, path, sizeof path) == 1;
-            const std::string use = has ? UseOf(path) : "";
             uint64_t sectors = 0;
             const bool sized = DiskSizeGet(pv.szPv, &sectors) == 1;
-            table.Add({DeviceName(pv.szPv), sized ? Cell(Bytes{sectors * 512}) : Cell(),
-                       *pv.szVg ? Cell(DeviceName(pv.szVg)) : Cell(), *pv.szVg ? Cell(int{pv.nPv}) : Cell(),
-                       has ? Cell(path) : Cell(), use.empty() ? Cell() : Cell(use),
-                       *pv.szUuid ? Cell(std::string(pv.szUuid)) : Cell()});
+            table.Add({DeviceName(pv.szPv), sized ? Cell(Bytes{sectors * 512}) : Cell(), Known(DeviceName(pv.szVg)),
+                       *pv.szVg ? Cell(int{pv.nPv}) : Cell(), has ? Cell(path) : Cell(),
+                       has ? Known(UseOf(path)) : Cell(), Known(pv.szUuid)});
         }
         call.Print(table);
         return exit_done;
@@ -144,12 +142,7 @@ class LvmCreate : public Verb {
         const std::string path = GroupPath(group_);
         const std::string attempted = "make the volume group " + path;
         RefuseWithoutLvm(attempted);
-        StringList devices;
-        std::vector<std::string> paths;
-        for (const std::string &word : words_) {
-            paths.push_back(DevicePath(word));
-            devices.Push(paths.back());
-        }
+        const std::vector<std::string> paths = DevicePaths(words_);
         LVMVG group;
         if (LVMVgSBGet(path.c_str(), &group) == 1)
             throw Failure{.attempted = attempted, .reason = "it is there already"};
@@ -164,7 +157,7 @@ class LvmCreate : public Verb {
             }
         }
         call.Confirm("Lose what is on " + Listed(paths) + "?");
-        if (LVMCreate(devices.Get(), path.c_str(), volume_.c_str(), nullptr, 0) != 0)
+        if (LVMCreate(StringList(paths).Get(), path.c_str(), volume_.c_str(), nullptr, 0) != 0)
             throw LibraryFailure(attempted, log_hint);
         return exit_done;
     }
@@ -175,14 +168,21 @@ class LvmCreate : public Verb {
     std::string volume_ = "lv";
 };
 
-class LvmRemove : public Verb {
+// A verb about a group that is there.
+class GroupVerb : public Verb {
+  public:
+    void Declare(Arguments &arguments) override { arguments.Text("GROUP", group_, group_help, GroupNames); }
+
+  protected:
+    std::string group_;
+};
+
+class LvmRemove : public GroupVerb {
   public:
     static constexpr VerbInfo info = {"remove", changes | destroys,
                                       "Removes a group with its volumes and its physical volumes. What is on it is "
                                       "lost; one that is in use is refused.",
                                       "tavoctl lvm remove vg1"};
-
-    void Declare(Arguments &arguments) override { arguments.Text("GROUP", group_, group_help, GroupNames); }
 
     int Run(const Call &call) override
     {
@@ -205,18 +205,15 @@ class LvmRemove : public Verb {
         }
         return exit_done;
     }
-
-  private:
-    std::string group_;
 };
 
-class LvmRename : public Verb {
+class LvmRename : public GroupVerb {
   public:
     static constexpr VerbInfo info = {"rename", changes, "Renames a group.", "tavoctl lvm rename vg1 vg2"};
 
     void Declare(Arguments &arguments) override
     {
-        arguments.Text("GROUP", group_, group_help, GroupNames);
+        GroupVerb::Declare(arguments);
         arguments.Text("NAME", name_, "the new name; it begins with vg");
     }
 
@@ -233,19 +230,16 @@ class LvmRename : public Verb {
     }
 
   private:
-    std::string group_;
     std::string name_;
 };
 
-class LvmExpand : public Verb {
+class LvmExpand : public GroupVerb {
   public:
     static constexpr VerbInfo info = {
         "expand", changes,
         "Has the physical volumes of a group use the whole of their devices, after an array "
         "has grown. The volume and its file system are not touched.",
         "tavoctl lvm expand vg1"};
-
-    void Declare(Arguments &arguments) override { arguments.Text("GROUP", group_, group_help, GroupNames); }
 
     int Run(const Call &) override
     {
@@ -262,9 +256,6 @@ class LvmExpand : public Verb {
             throw LibraryFailure(attempted, log_hint);
         return exit_done;
     }
-
-  private:
-    std::string group_;
 };
 
 }  // namespace

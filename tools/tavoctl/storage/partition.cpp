@@ -4,7 +4,7 @@
 #include "frame/failure.h"
 #include "frame/program.h"
 #include "frame/table.h"
-#include "storage/device.h"
+#include "storage/disk_verb.h"
 
 #include "tavo_lvm.h"
 #include "tavo_partition.h"
@@ -15,9 +15,6 @@
 
 namespace tavoctl {
 namespace {
-
-constexpr char disk_help[] = "its name, sda or /dev/sda";
-constexpr char wake_help[] = "read it although that wakes it";
 
 std::string TypeText(uint32_t type)
 {
@@ -92,14 +89,13 @@ class PartitionList : public Verb {
         const int64_t sectors = asks ? RCPartitionConfigs(NumberOf(partition), disk.c_str(), &start, &type) : -1;
         uint64_t counted = 0;
         const bool sized = DiskSizeGet(partition.c_str(), &counted) == 1;
-        const std::string use = UseOf(partition);
         return {DeviceName(partition),
                 sectors < 0 ? Cell() : Cell(start),
                 sectors < 0 ? Cell() : Cell(sectors),
                 sized ? Cell(Bytes{counted * 512}) : Cell(),
                 sectors < 0 ? Cell() : Cell(TypeText(type)),
                 sectors < 0 ? Cell() : Cell(TypeName(type)),
-                use.empty() ? Cell() : Cell(use)};
+                Known(UseOf(partition))};
     }
 
     std::string disk_;
@@ -195,7 +191,7 @@ struct Choice {
     }
 };
 
-class CreatePartitions : public Verb {
+class CreatePartitions : public DiskVerb {
   public:
     static constexpr VerbInfo info = {"create", changes | destroys,
                                       "Makes the system's partitions on a disk: --system partitions 1 and 2, on an "
@@ -208,7 +204,7 @@ class CreatePartitions : public Verb {
 
     void Declare(Arguments &arguments) override
     {
-        arguments.Text("DISK", disk_, disk_help, DiskNames);
+        DiskVerb::Declare(arguments);
         choice_.Declare(arguments, "partitions 1 and 2, on an empty table", "partition 3");
         arguments.Number("--version", "VERSION", version_, "of the layout; 0: the one that the system carries (0)");
     }
@@ -233,12 +229,11 @@ class CreatePartitions : public Verb {
     }
 
   private:
-    std::string disk_;
     Choice choice_;
     int version_ = 0;
 };
 
-class CleanPartitions : public Verb {
+class CleanPartitions : public DiskVerb {
   public:
     static constexpr VerbInfo info = {"clean", changes | destroys,
                                       "Empties entries of a disk's partition table and erases the RAID superblocks "
@@ -249,7 +244,7 @@ class CleanPartitions : public Verb {
 
     void Declare(Arguments &arguments) override
     {
-        arguments.Text("DISK", disk_, disk_help, DiskNames);
+        DiskVerb::Declare(arguments);
         choice_.Declare(arguments, "partitions 1 and 2, and with the table the others", "partitions 3 to 15");
         arguments.Flag("--table", table_, "the table alone");
     }
@@ -281,21 +276,14 @@ class CleanPartitions : public Verb {
         return partitions;
     }
 
-    std::string disk_;
     Choice choice_;
     bool table_ = false;
 };
 
-class PartitionTable : public Verb {
+class PartitionTable : public WakingVerb {
   public:
     static constexpr VerbInfo info = {"table", reads, "Prints the kind of a disk's partition table: none, mbr or gpt.",
                                       "tavoctl partition table sda"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("DISK", disk_, disk_help, DiskNames);
-        arguments.Flag("--wake", wake_, wake_help);
-    }
 
     int Run(const Call &call) override
     {
@@ -312,10 +300,6 @@ class PartitionTable : public Verb {
         call.PrintValue(text, record);
         return exit_done;
     }
-
-  private:
-    std::string disk_;
-    bool wake_ = false;
 };
 
 }  // namespace

@@ -17,12 +17,6 @@
 namespace tavoctl {
 namespace {
 
-Cell ActionCell(const RAIDINFO &info)
-{
-    const std::string action = ActionOf(info);
-    return action.empty() ? Cell() : Cell(action);
-}
-
 Cell PercentCell(const RAIDINFO &info)
 {
     const auto rebuild = RebuildOf(info);
@@ -52,7 +46,7 @@ class RaidList : public Verb {
                 members.push_back(DeviceName(path));
             table.Add({DeviceName(array->szPath), LevelText(array->fLevel), StatusText(array->nStatus),
                        Bytes{array->cbArray}, int{array->nSlot}, int{array->nWorking}, int{array->nFailed},
-                       ActionCell(*array), PercentCell(*array), members});
+                       Known(ActionOf(*array)), PercentCell(*array), members});
         }
         call.Print(table);
         return exit_done;
@@ -90,15 +84,14 @@ class RaidInfo : public Verb {
         record.Add("spare", Members(*array, RAID_MEMBER_SPARE));
         record.Add("failed", Members(*array, RAID_MEMBER_FAILED));
         record.Add("fatal", Members(*array, RAID_MEMBER_FATAL));
-        record.Add("action", ActionCell(*array));
+        record.Add("action", Known(ActionOf(*array)));
         record.Add("percent", PercentCell(*array));
         record.Add("seconds_left",
                    rebuild && rebuild->speed
                        ? Cell(static_cast<int64_t>((rebuild->total - rebuild->done) / 2 / rebuild->speed))
                        : Cell());
         record.Add("uuid", Uuid(*array));
-        const std::string use = UseOf(array->szPath);
-        record.Add("use", use.empty() ? Cell() : Cell(use));
+        record.Add("use", Known(UseOf(array->szPath)));
         call.Print(record);
         return exit_done;
     }
@@ -209,8 +202,8 @@ class RaidSuperblock : public Verb {
         Table table({"member", "array", "level", "members", "slot", "version", "events", "uuid"});
         for (int i = 0; i < count; ++i) {
             const RAIDSUPERBLOCK &found = entries[i].superblock;
-            table.Add({DeviceName(entries[i].szMember), *found.szArray ? Cell(DeviceName(found.szArray)) : Cell(),
-                       LevelText(found.fLevel), int{found.nMember}, int{found.iRole},
+            table.Add({DeviceName(entries[i].szMember), Known(DeviceName(found.szArray)), LevelText(found.fLevel),
+                       int{found.nMember}, int{found.iRole},
                        std::to_string(found.nMajor) + "." + std::to_string(found.nMinor), int{found.nEvent},
                        std::string(found.szUuid)});
         }

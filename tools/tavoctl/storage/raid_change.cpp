@@ -16,20 +16,19 @@ constexpr char array_help[] = "its name, md2 or /dev/md2";
 constexpr char member_help[] = "a partition or disk, sda3 or /dev/sda3";
 constexpr char log_hint[] = "look at the system log";
 
-std::vector<std::string> DevicePaths(const std::vector<std::string> &words)
-{
-    std::vector<std::string> paths;
-    for (const std::string &word : words)
-        paths.push_back(DevicePath(word));
-    return paths;
-}
-
 bool Runs(const std::string &path)
 {
     RAIDINFO *info = nullptr;
     const bool runs = RAIDInfoGet(path.c_str(), &info) == 1;
     RAIDInfoFree(info);
     return runs;
+}
+
+// What is on the devices is going to be lost.
+void ConfirmLoss(const Call &call, const std::vector<std::string> &paths, const std::string &attempted)
+{
+    RefuseUsed(paths, attempted);
+    call.Confirm("Lose what is on " + Listed(paths) + "?");
 }
 
 void RefuseUsedArray(const std::string &path, const std::string &attempted)
@@ -72,11 +71,8 @@ class RaidCreate : public Verb {
         RefuseTwice(paths, attempted);
         if (Runs(path))
             throw Failure{.attempted = attempted, .reason = "it runs", .hint = "stop it first", .status = exit_busy};
-        RefuseUsed(paths, attempted);
-        call.Confirm("Lose what is on " + Listed(paths) + "?");
-        StringList members;
-        for (const std::string &member : paths)
-            members.Push(member);
+        ConfirmLoss(call, paths, attempted);
+        const StringList members(paths);
         const int active = static_cast<int>(paths.size()) - spares_;
         const RAIDREQUEST request = {.szPath = path.c_str(),
                                      .pVersion = nullptr,
@@ -109,7 +105,22 @@ class RaidCreate : public Verb {
     bool no_sync_ = false;
 };
 
-class RaidAdd : public Verb {
+// A verb about an array that runs and members of it.
+template <int AtLeast>
+class MembersVerb : public Verb {
+  public:
+    void Declare(Arguments &arguments) override
+    {
+        arguments.Text("ARRAY", array_, array_help, ArrayNames);
+        arguments.Texts("MEMBER", words_, member_help, AtLeast, DeviceNames);
+    }
+
+  protected:
+    std::string array_;
+    std::vector<std::string> words_;
+};
+
+class RaidAdd : public MembersVerb<1> {
   public:
     static constexpr VerbInfo info = {"add", changes | destroys,
                                       "Adds members to an array: a degraded one is rebuilt onto the first, the others "
@@ -118,12 +129,6 @@ class RaidAdd : public Verb {
                                       "tavoctl raid add md2 sdd3\n"
                                       "tavoctl raid add --yes md2 sdd3"};
 
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("ARRAY", array_, array_help, ArrayNames);
-        arguments.Texts("MEMBER", words_, member_help, 1, DeviceNames);
-    }
-
     int Run(const Call &call) override
     {
         const Array array = ReadArray(ArrayPath(array_));
@@ -131,8 +136,7 @@ class RaidAdd : public Verb {
         const std::string attempted = "add " + Listed(paths) + " to " + array->szPath;
         if (array->fLevel == RAID_LEVEL_0)
             throw Failure{.attempted = attempted, .reason = "a RAID 0 takes no members"};
-        RefuseUsed(paths, attempted);
-        call.Confirm("Lose what is on " + Listed(paths) + "?");
+        ConfirmLoss(call, paths, attempted);
         for (const std::string &path : paths) {
             if (RAIDAddRobustCheck(array.get(), path.c_str()) != 0)
                 throw LibraryFailure("add " + path + " to " + array->szPath,
@@ -140,13 +144,9 @@ class RaidAdd : public Verb {
         }
         return exit_done;
     }
-
-  private:
-    std::string array_;
-    std::vector<std::string> words_;
 };
 
-class RaidRemove : public Verb {
+class RaidRemove : public MembersVerb<0> {
   public:
     static constexpr VerbInfo info = {"remove", changes | destroys,
                                       "Removes failed and spare members from an array. Without MEMBER the whole array "
@@ -155,12 +155,6 @@ class RaidRemove : public Verb {
                                       "array that is in use is refused.",
                                       "tavoctl raid remove md2 sdd3\n"
                                       "tavoctl raid remove md3"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("ARRAY", array_, array_help, ArrayNames);
-        arguments.Texts("MEMBER", words_, member_help, 0, DeviceNames);
-    }
 
     int Run(const Call &call) override
     {
@@ -200,12 +194,9 @@ class RaidRemove : public Verb {
                 throw LibraryFailure("remove " + path + " from " + array.szPath, log_hint);
         }
     }
-
-    std::string array_;
-    std::vector<std::string> words_;
 };
 
-class RaidMigrate : public Verb {
+class RaidMigrate : public MembersVerb<1> {
   public:
     static constexpr VerbInfo info = {"migrate", changes | destroys,
                                       "Turns a RAID 5 into a RAID 6 with a new member, which is rebuilt onto in the "
@@ -214,12 +205,6 @@ class RaidMigrate : public Verb {
                                       "right. What is on them is lost.",
                                       "tavoctl raid migrate md2 sde3"};
 
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("ARRAY", array_, array_help, ArrayNames);
-        arguments.Texts("MEMBER", words_, member_help, 1, DeviceNames);
-    }
-
     int Run(const Call &call) override
     {
         const Array array = ReadArray(ArrayPath(array_));
@@ -227,19 +212,12 @@ class RaidMigrate : public Verb {
         if (array->fLevel != RAID_LEVEL_5)
             throw Failure{.attempted = attempted, .reason = "it is a " + LevelText(array->fLevel)};
         const std::vector<std::string> paths = DevicePaths(words_);
-        RefuseUsed(paths, attempted);
-        call.Confirm("Lose what is on " + Listed(paths) + "?");
-        StringList members;
-        for (const std::string &path : paths)
-            members.Push(path);
+        ConfirmLoss(call, paths, attempted);
+        const StringList members(paths);
         if (RAIDMigrate2RAID6(array.get(), members.Get()) != 0)
             throw LibraryFailure(attempted, log_hint);
         return exit_done;
     }
-
-  private:
-    std::string array_;
-    std::vector<std::string> words_;
 };
 
 class RaidStop : public Verb {
