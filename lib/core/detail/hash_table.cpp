@@ -1,103 +1,15 @@
-// The table of a string hash: where a key stands, how a pair is stored, how the block grows.
+// The block of a string hash: how a pair is stored, how the block grows.
 #include "core/detail/hash_table.h"
 
+#include "core/detail/hash_slot.h"
 #include "core/detail/text_overlap.h"
 
-#include <bit>
 #include <climits>
 #include <cstdlib>
 #include <cstring>
 
 namespace tavo {
 namespace {
-
-static_assert(std::endian::native == std::endian::little, "the words of a key are read as they stand in memory");
-
-template <class Word>
-Word Load(const char *at)
-{
-    Word word;
-    std::memcpy(&word, at, sizeof word);
-    return word;
-}
-
-// The one to three bytes behind the last whole word, as a word; 0 when there are none.
-uint32_t LastWord(std::string_view key)
-{
-    const size_t left = key.size() % 4;
-    const char *at = key.data() + (key.size() - left);
-    if (key.size() >= 4)
-        return static_cast<uint32_t>(uint64_t{Load<uint32_t>(at + left - 4)} >> (32 - 8 * left));
-    uint32_t word = 0;
-    for (size_t i = 0; i < left; ++i)
-        word |= uint32_t{static_cast<unsigned char>(at[i])} << (8 * i);
-    return word;
-}
-
-uint32_t WordSum(std::string_view key)
-{
-    uint32_t sum = LastWord(key);
-    const char *at = key.data();
-    size_t left = key.size();
-    for (; left >= 8; left -= 8, at += 8) {
-        const auto words = Load<uint64_t>(at);
-        sum += static_cast<uint32_t>(words) + static_cast<uint32_t>(words >> 32);
-    }
-    return left >= 4 ? sum + Load<uint32_t>(at) : sum;
-}
-
-// A division by a number known to the compiler is a multiplication; these are the tables that every hash begins with.
-uint32_t Modulo(uint32_t sum, uint32_t slots)
-{
-    switch (slots) {
-    case 31:
-        return sum % 31;
-    case 119:
-        return sum % 119;
-    case 471:
-        return sum % 471;
-    case 1879:
-        return sum % 1879;
-    case 7511:
-        return sum % 7511;
-    default:
-        return sum % slots;
-    }
-}
-
-const char *StringEnd(const TLIBSZHASH *hash)
-{
-    return reinterpret_cast<const char *>(hash->slots + hash->nSlot) + hash->nStrSize;
-}
-
-int Next(const TLIBSZHASH *hash, int slot)
-{
-    return slot + 1 == hash->nSlot ? 0 : slot + 1;
-}
-
-// Whether two stretches of `bytes` readable bytes are the same. Keys are short: a call of memcmp costs more than they do.
-bool SameBytes(const char *a, const char *b, size_t bytes)
-{
-    if (bytes < 8) {
-        while (bytes > 0 && a[bytes - 1] == b[bytes - 1])
-            --bytes;
-        return bytes == 0;
-    }
-    for (size_t i = 0; i + 8 <= bytes; i += 8) {
-        if (Load<uint64_t>(a + i) != Load<uint64_t>(b + i))
-            return false;
-    }
-    return Load<uint64_t>(a + bytes - 8) == Load<uint64_t>(b + bytes - 8);
-}
-
-// A key is compared with its NUL. What stands behind a shorter one is in the block too, except at its very end.
-bool Holds(const TLIBSZHASHSLOT &slot, std::string_view key, const char *end)
-{
-    const size_t bytes = key.size() + 1;
-    if (static_cast<size_t>(end - slot.pszKey) < bytes)
-        return false;
-    return SameBytes(slot.pszKey, key.data(), bytes);
-}
 
 char *StoreText(TLIBSZHASH *hash, std::string_view text)
 {
@@ -132,7 +44,7 @@ int FirstFreeSlot(const TLIBSZHASH *hash, std::string_view key)
     const int home = HomeSlot(key, hash->nSlot);
     int slot = home;
     while (slot >= 0 && IsPair(hash->slots[slot])) {
-        slot = Next(hash, slot);
+        slot = NextSlot(hash, slot);
         if (slot == home)
             return -1;
     }
@@ -144,60 +56,6 @@ int FirstFreeSlot(const TLIBSZHASH *hash, std::string_view key)
 char *StringArea(TLIBSZHASH *hash) noexcept
 {
     return reinterpret_cast<char *>(hash->slots + hash->nSlot);
-}
-
-int HomeSlot(std::string_view key, int slots) noexcept
-{
-    return slots > 0 ? static_cast<int>(Modulo(WordSum(key), static_cast<uint32_t>(slots))) : -1;
-}
-
-int FindPair(const TLIBSZHASH *hash, std::string_view key) noexcept
-{
-    const int home = HomeSlot(key, hash->nSlot);
-    if (home < 0)
-        return -1;
-    const char *end = StringEnd(hash);
-    int slot = home;
-    do {
-        const TLIBSZHASHSLOT &at = hash->slots[slot];
-        if (IsPair(at)) {
-            if (Holds(at, key, end))
-                return slot;
-        } else if (IsNeverUsed(at)) {
-            return -1;
-        }
-        slot = Next(hash, slot);
-    } while (slot != home);
-    return -1;
-}
-
-Place FindPlace(const TLIBSZHASH *hash, std::string_view key) noexcept
-{
-    const int home = HomeSlot(key, hash->nSlot);
-    if (home < 0)
-        return {};
-    const char *end = StringEnd(hash);
-    const TLIBSZHASHSLOT &first = hash->slots[home];
-    if (IsNeverUsed(first) || (IsPair(first) && Holds(first, key, end)))
-        return {home, -1};
-    Place place;
-    if (!IsPair(first))
-        place.spare = home;
-    for (int slot = Next(hash, home); slot != home; slot = Next(hash, slot)) {
-        const TLIBSZHASHSLOT &at = hash->slots[slot];
-        if (IsPair(at)) {
-            if (Holds(at, key, end))
-                return {slot, -1};
-        } else if (!IsNeverUsed(at)) {
-            if (place.usual < 0)
-                place.usual = slot;
-        } else {
-            if (place.spare < 0)
-                place.spare = slot;
-            break;
-        }
-    }
-    return place;
 }
 
 TLIBSZHASH *NewHash(int64_t slots, int64_t string_bytes) noexcept

@@ -28,9 +28,6 @@ inline int64_t PairBytes(std::string_view key, std::string_view value)
 
 char *StringArea(TLIBSZHASH *hash) noexcept;
 
-// The home slot of the key; -1 when the table has no slots.
-int HomeSlot(std::string_view key, int slots) noexcept;
-
 // The slot that holds the key, or -1.
 int FindPair(const TLIBSZHASH *hash, std::string_view key) noexcept;
 

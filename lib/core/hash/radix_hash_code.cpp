@@ -1,7 +1,7 @@
 // The hash function.
 #include "tavo_hash.h"
 
-#include "core/detail/hash_table.h"
+#include "core/detail/hash_slot.h"
 
 extern "C" int TLIBIRadixHashCode(const char *szKey, int nSlot)
 {
