@@ -34,14 +34,23 @@ std::optional<LineSpan> LineByKey(std::string_view text, std::string_view key)
     return FindSpan(text, [&](std::string_view line) { return LineSetsKey(line, key); });
 }
 
-std::string WithLine(std::string_view text, LineSpan span, std::string_view line)
+std::optional<std::string> WithLine(std::string_view text, std::optional<LineSpan> span, std::string_view line)
 {
+    if (!span)
+        return std::nullopt;
     std::string changed;
     changed.reserve(text.size() + line.size());
-    changed += text.substr(0, span.begin);
+    changed += text.substr(0, span->begin);
     changed += line;
-    changed += text.substr(span.begin + span.length);
+    changed += text.substr(span->begin + span->length);
     return changed;
+}
+
+std::optional<std::string> WithLineBefore(std::string_view text, std::optional<LineSpan> span, std::string_view line)
+{
+    if (span)
+        span->length = 0;
+    return WithLine(text, span, line);
 }
 
 void AppendLine(std::string &text, std::string_view line)

@@ -17,8 +17,9 @@ struct LineSpan {
 std::optional<LineSpan> LineByNumber(std::string_view text, int number);  // from 1
 std::optional<LineSpan> LineByKey(std::string_view text, std::string_view key);
 
-// The text with `line` in place of the span; of an empty span: before it.
-std::string WithLine(std::string_view text, LineSpan span, std::string_view line);
+// The text with `line` in place of the span, or before it; empty when there is no such span.
+std::optional<std::string> WithLine(std::string_view text, std::optional<LineSpan> span, std::string_view line);
+std::optional<std::string> WithLineBefore(std::string_view text, std::optional<LineSpan> span, std::string_view line);
 
 // Appends a line; a last line that lacks its newline gets it first, or the two would become one.
 void AppendLine(std::string &text, std::string_view line);

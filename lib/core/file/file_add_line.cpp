@@ -2,7 +2,6 @@
 #include "tavo_file.h"
 
 #include "core/detail/rewrite_report.h"
-#include "core/detail/settings_text.h"
 
 namespace {
 
@@ -13,10 +12,7 @@ std::optional<std::string> WithNewLine(std::string_view text, int number, std::s
         tavo::AppendLine(changed, line);
         return changed;
     }
-    const std::optional<tavo::LineSpan> span = tavo::LineByNumber(text, number);
-    if (!span)
-        return std::nullopt;
-    return tavo::WithLine(text, {span->begin, 0}, line);
+    return tavo::WithLineBefore(text, tavo::LineByNumber(text, number), line);
 }
 
 }  // namespace
@@ -25,11 +21,6 @@ extern "C" int TLIBFileAddLine(const char *szPath, int lineNo, const char *szLin
 {
     if (!szPath || lineNo < 0 || !szLine)
         return Fail(ERR_BAD_PARAMETERS);
-    return Guard([&] {
-        const std::optional<std::string> line = tavo::OneLine(szLine);
-        if (!line)
-            return Fail(ERR_BAD_PARAMETERS);
-        return tavo::RewriteText(szPath, tavo::Missing::fail,
-                                 [&](std::string_view text) { return WithNewLine(text, lineNo, *line); });
-    });
+    return tavo::RewriteWithLine(
+        szPath, szLine, [&](std::string_view text, std::string_view line) { return WithNewLine(text, lineNo, line); });
 }

@@ -82,10 +82,8 @@ extern "C" int TLIBFileComment(const char *szPath, const char *szKey)
     return Guard([&] {
         tavo::FileRewrite rewrite;
         std::string text;
-        if (const int code = rewrite.Open(szPath))
-            return Fail(code);
-        if (!rewrite.Read(text))
-            return Fail(ERR_WRITE_FAILED);
+        if (tavo::ReadOrFail(rewrite, szPath, text) != 0)
+            return -1;
         const std::optional<std::string> changed = WithComments(text, szKey);
         if (!changed)
             return static_cast<int>(FailZero(ERR_KEY_NOT_FOUND));

@@ -30,10 +30,8 @@ extern "C" int TLIBFileReplaceSubStr(const char *szPath, const char *szOld, cons
     return Guard([&] {
         tavo::FileRewrite rewrite;
         std::string text;
-        if (const int code = rewrite.Open(szPath))
-            return Fail(code);
-        if (!rewrite.Read(text))
-            return Fail(ERR_WRITE_FAILED);
+        if (tavo::ReadOrFail(rewrite, szPath, text) != 0)
+            return -1;
         int count = 0;
         const std::string changed = Replaced(text, old_piece, new_piece, count);
         return count == 0 || tavo::ReplaceOrFail(rewrite, changed) == 0 ? count : -1;

@@ -10,10 +10,8 @@ extern "C" int TLIBFileUTF8BomStrip(const char *szPath)
     return Guard([&] {
         tavo::FileRewrite rewrite;
         std::string text;
-        if (const int code = rewrite.Open(szPath))
-            return Fail(code);
-        if (!rewrite.Read(text))
-            return Fail(ERR_WRITE_FAILED);
+        if (tavo::ReadOrFail(rewrite, szPath, text) != 0)
+            return -1;
         constexpr std::string_view mark = "\xEF\xBB\xBF";
         if (!text.starts_with(mark))
             return 0;

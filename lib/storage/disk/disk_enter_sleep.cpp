@@ -1,8 +1,7 @@
 // Puts a drive to sleep.
 #include "tavo_disk.h"
 
-#include "core/detail/guard.h"
-#include "storage/detail/raw_disk.h"
+#include "storage/detail/raw_disk_report.h"
 
 #include <cstdint>
 
@@ -18,10 +17,7 @@ extern "C" int TAVOIDiskEnterSleep(const char *szPath)
 {
     if (!szPath)
         return Fail(ERR_BAD_PARAMETERS);
-    return Guard([&] {
-        tavo::RawDisk disk;
-        if (const int code = disk.Open(szPath))
-            return Fail(code);
+    return tavo::WithRawDisk(szPath, [&](const tavo::RawDisk &disk) {
         disk.DriveCommand(kFlushCache);
         return disk.DriveCommand(kSleep) || disk.DriveCommand(kOldSleep) ? 0 : -1;
     });

@@ -1,9 +1,8 @@
 // Writes everything that the kernel and the drive hold for a disk.
 #include "tavo_disk.h"
 
-#include "core/detail/guard.h"
 #include "core/detail/log.h"
-#include "storage/detail/raw_disk.h"
+#include "storage/detail/raw_disk_report.h"
 
 #include <linux/fs.h>
 #include <sys/ioctl.h>
@@ -13,10 +12,7 @@ extern "C" int TAVOIDiskFlushBuffer(const char *szPath)
 {
     if (!szPath)
         return Fail(ERR_BAD_PARAMETERS);
-    return Guard([&] {
-        tavo::RawDisk disk;
-        if (const int code = disk.Open(szPath))
-            return Fail(code);
+    return tavo::WithRawDisk(szPath, [&](const tavo::RawDisk &disk) {
         const int fd = disk.Descriptor();
         ::sync();
         const int failures = ::fsync(fd) | ::fdatasync(fd);

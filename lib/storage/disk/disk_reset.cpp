@@ -1,8 +1,7 @@
 // Resets a drive.
 #include "tavo_disk.h"
 
-#include "core/detail/guard.h"
-#include "storage/detail/raw_disk.h"
+#include "storage/detail/raw_disk_report.h"
 
 #include <linux/hdreg.h>
 #include <sys/ioctl.h>
@@ -18,10 +17,7 @@ extern "C" int TAVOIDiskReset(const char *szPath)
 {
     if (!szPath)
         return Fail(ERR_BAD_PARAMETERS);
-    return Guard([&] {
-        tavo::RawDisk disk;
-        if (const int code = disk.Open(szPath))
-            return Fail(code);
+    return tavo::WithRawDisk(szPath, [&](const tavo::RawDisk &disk) {
         int result = ::ioctl(disk.Descriptor(), HDIO_DRIVE_RESET, nullptr);
         ::sleep(kComesBack);
         result |= ::ioctl(disk.Descriptor(), HDIO_SET_DMA, 1);

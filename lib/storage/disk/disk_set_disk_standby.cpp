@@ -1,9 +1,8 @@
 // Spins one disk down.
 #include "tavo_disk.h"
 
-#include "core/detail/guard.h"
 #include "core/detail/log.h"
-#include "storage/detail/raw_disk.h"
+#include "storage/detail/raw_disk_report.h"
 
 extern "C" int TAVOIDiskSetDiskStandby(const char *szPath)
 {
@@ -11,10 +10,7 @@ extern "C" int TAVOIDiskSetDiskStandby(const char *szPath)
         LogError("%s:%d argument should not be NULL");
         return Fail(ERR_BAD_PARAMETERS);
     }
-    return Guard([&] {
-        tavo::RawDisk disk;
-        if (const int code = disk.Open(szPath))
-            return Fail(code);
+    return tavo::WithRawDisk(szPath, [&](const tavo::RawDisk &disk) {
         unsigned char state = 0;
         if (disk.Command(DISK_COMMAND_CHECK_POWER, &state) != 0)
             return -1;

@@ -1,18 +1,14 @@
 // Sets the spin-down timer of one drive.
 #include "tavo_disk.h"
 
-#include "core/detail/guard.h"
-#include "storage/detail/raw_disk.h"
+#include "storage/detail/raw_disk_report.h"
 
 extern "C" int TAVOIDiskSetDiskStandbyTimer(const char *szPath, int nValue)
 {
     constexpr uint8_t idle = 0xE3;
     if (!szPath || nValue < 0 || nValue > 255)
         return Fail(ERR_BAD_PARAMETERS);
-    return Guard([&] {
-        tavo::RawDisk disk;
-        if (const int code = disk.Open(szPath))
-            return Fail(code);
+    return tavo::WithRawDisk(szPath, [&](const tavo::RawDisk &disk) {
         unsigned char value = static_cast<unsigned char>(nValue);
         if (disk.IsMarvell())
             return disk.Command(DISK_COMMAND_SET_TIMER, &value);

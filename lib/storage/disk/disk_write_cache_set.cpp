@@ -1,9 +1,8 @@
 // Switches the write cache of a drive.
 #include "tavo_disk.h"
 
-#include "core/detail/guard.h"
 #include "storage/detail/caching_page.h"
-#include "storage/detail/raw_disk.h"
+#include "storage/detail/raw_disk_report.h"
 
 namespace {
 
@@ -23,10 +22,7 @@ extern "C" int TAVODiskWriteCacheSet(const char *szPath, int fEnable)
 {
     if (!szPath)
         return Fail(ERR_BAD_PARAMETERS);
-    return Guard([&] {
-        tavo::RawDisk disk;
-        if (const int code = disk.Open(szPath))
-            return Fail(code);
+    return tavo::WithRawDisk(szPath, [&](const tavo::RawDisk &disk) {
         const bool done = disk.IsMarvell() ? SwitchByPage(disk.Descriptor(), fEnable != 0)
                                            : disk.DriveCommand(kSetFeatures, 0, fEnable ? kEnableCache : kDisableCache);
         return done ? 0 : -1;

@@ -1,0 +1,27 @@
+// How an exported function works on a raw disk and reports one that cannot be opened, under its own module name.
+#ifndef TAVO_STORAGE_DETAIL_RAW_DISK_REPORT_H
+#define TAVO_STORAGE_DETAIL_RAW_DISK_REPORT_H
+
+#include "core/detail/guard.h"
+#include "storage/detail/raw_disk.h"
+
+namespace tavo {
+namespace {
+
+// What the body gives for the open disk; -1 with a code of OpenRawDisk.
+template <class Body>
+int WithRawDisk(const char *path, Body &&body, Line line = Line{__builtin_LINE()})
+{
+    const auto open_first = [&]() -> int {
+        RawDisk disk;
+        if (const int code = disk.Open(path))
+            return Fail(code, line);
+        return body(disk);
+    };
+    return Guard(open_first, ERR_OUT_OF_MEMORY, line);
+}
+
+}  // namespace
+}  // namespace tavo
+
+#endif
