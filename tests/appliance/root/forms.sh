@@ -20,6 +20,9 @@ for form in $forms; do
     probe mknod 'mknod /tmp/x b 8 0'
     probe uids 'touch /tmp/x && chown 1024:100 /tmp/x && [ "$(stat -c %u:%g /tmp/x)" = 1024:100 ]'
     probe pts '[ -c /dev/ptmx ]'
+    # An emulator of single programs has threads, and so cannot enter mounts; any program may stand for one here.
+    [[ ,$($enter --form "$form" --emulator "$root/bin/enter" -- /bin/sh -c 'echo $TAVO_ROOT_LACKS'), == *,setns,* ]] ||
+        complain "$form: an emulator that is said to enter namespaces"
     inside 'echo x >/dev/null && [ "$(head -c 4 /dev/zero | wc -c)" = 4 ] && head -c 4 /dev/urandom >/dev/null' ||
         complain "$form: device nodes"
     inside '[ "$(id -u)" = 0 ] && [ "$(stat -c %a /tmp)" = 1777 ] && [ "$(stat -c %a /etc/shadow)" = 600 ] && [ "$(umask)" = 0022 ]' ||
