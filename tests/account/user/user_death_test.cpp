@@ -153,26 +153,46 @@ TEST(UserDeath, AtRandomMoments)
         ::mmap(nullptr, sizeof(Journal), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0));
     ASSERT_NE(journal, MAP_FAILED);
     std::mt19937 random(7);
-    // Step s of the child: an account is added, renamed (its name says how often), and deleted two rounds later.
-    const auto step = [](int s) {
-        const std::string name = "user" + std::to_string(s / 3);
-        if (s % 3 == 0)
-            AddUser({.name = name, .password = "x"});
-        else if (s % 3 == 1)
-            test::Rename(name, name + "b");
-        else if (s >= 6)
-            test::DeleteUser("user" + std::to_string(s / 3 - 2) + "b");
+    // Step s of the child: accounts are added, renamed (their names say so), and deleted two rounds later, each time
+    // all of a batch in one call.
+    const auto names_of = [](int round, const std::string &suffix) {
+        std::vector<std::string> names;
+        for (const char *member : {"x", "y", "z"})
+            names.push_back("user" + std::to_string(round) + member + suffix);
+        return names;
     };
-    const auto names_after = [](int s) {
+    const auto step = [&](int s) {
+        const auto names = names_of(s / 3, s % 3 == 0 ? "" : "b");
+        const auto old_names = names_of(s / 3, "");
+        if (s % 3 == 2 && s < 6)
+            return;
+        const auto doomed = names_of(s / 3 - 2, "b");
+        std::vector<test::User> users;
+        std::vector<const TAVOUSER *> records;
+        std::vector<const char *> old;
+        std::vector<const char *> gone;
+        for (size_t i = 0; i < names.size(); ++i) {
+            users.push_back(test::MakeUser({.name = names[i], .password = "x"}));
+            records.push_back(users.back().get());
+            old.push_back(s % 3 == 0 ? nullptr : old_names[i].c_str());
+            gone.push_back(doomed[i].c_str());
+        }
+        if (s % 3 == 2)
+            TAVOUserDelete(gone.data(), static_cast<int>(gone.size()));
+        else
+            TAVOUserSet(old.data(), records.data(), static_cast<int>(records.size()));
+    };
+    const auto names_after = [&](int s) {
         std::set<std::string> names;
         for (int i = 0; i < s; ++i) {
-            const std::string name = "user" + std::to_string(i / 3);
-            if (i % 3 == 0)
-                names.insert(name);
-            else if (i % 3 == 1)
-                names.erase(name), names.insert(name + "b");
-            else if (i >= 6)
-                names.erase("user" + std::to_string(i / 3 - 2) + "b");
+            for (const std::string &name : names_of(i / 3 - (i % 3 == 2 ? 2 : 0), i % 3 == 2 ? "b" : "")) {
+                if (i % 3 == 0)
+                    names.insert(name);
+                else
+                    names.erase(name);
+                if (i % 3 == 1)
+                    names.insert(name + "b");
+            }
         }
         return names;
     };
