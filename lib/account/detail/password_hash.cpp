@@ -23,7 +23,8 @@ std::string FreshSetting(time_t now)
 
 std::string Crypt(const std::string &clear, const std::string &setting)
 {
-    const auto scratch = std::make_unique<crypt_data>();
+    const auto scratch = std::make_unique_for_overwrite<crypt_data>();  // 32 KiB, of which this field is read
+    scratch->initialized = 0;
     const char *hash = ::crypt_r(clear.c_str(), setting.c_str(), scratch.get());
     std::string result = hash && *hash != '*' ? hash : "";
     ::explicit_bzero(scratch.get(), sizeof *scratch);
