@@ -1,14 +1,17 @@
 // The locks: counting, refusals, time-outs, forked children, and what others may have put in /tmp.
 #include "tavo_lock.h"
 
+#include "support/appliance_root.h"
 #include "support/descriptors.h"
 #include "support/failing_malloc.h"
 #include "support/fault_state.h"
+#include "support/own_child.h"
 
 #include <gtest/gtest.h>
 
 #include <cerrno>
 #include <climits>
+#include <cstdlib>
 #include <cstring>
 #include <ctime>
 #include <filesystem>
@@ -69,7 +72,7 @@ class Lock : public testing::Test {
   protected:
     void SetUp() override
     {
-        if (!fs::exists("/etc.defaults/tavoinfo.conf"))
+        if (test::RootForm().empty())
             GTEST_SKIP() << "only in an appliance root";
         Forget();
     }
@@ -114,17 +117,6 @@ bool IsFree(unsigned bit, int operation)
     const bool free = syscall(SYS_flock, fd, operation | LOCK_NB) == 0;
     ::close(fd);
     return free;
-}
-
-// Runs in a forked child; true when `body` is.
-bool InChild(const std::function<bool()> &body)
-{
-    const pid_t pid = ::fork();
-    if (pid == 0)
-        ::_exit(body() ? 0 : 1);
-    int status = -1;
-    ::waitpid(pid, &status, 0);
-    return status == 0;
 }
 
 TEST(LockTable, IsTheKnownOne)
@@ -307,12 +299,12 @@ TEST_F(Lock, ForkedChildrenLeaveTheirParentsLocksAlone)
 {
     ASSERT_EQ(ErrTLIBFileLock(0x816, 0), 0);
     ASSERT_EQ(ErrTLIBFileLock(0x806, 0), 0);
-    EXPECT_TRUE(InChild([] {
+    EXPECT_TRUE(test::InChild([] {
         return ErrTLIBFileCloseLock() == 0 && !Entry(0x800).pfLock && Entry(0x800).nRef == 0 &&
                ErrTLIBFileLock(0x806, 0) == -1;
     }));
     EXPECT_FALSE(IsFree(0x800, LOCK_SH)) << "closing in a child frees nothing";
-    EXPECT_TRUE(InChild([] {
+    EXPECT_TRUE(test::InChild([] {
         return ErrTLIBFileResetLock(0x800) == 0 && Entry(0x800).nRef == 1 && !Entry(0x10).pfLock &&
                Entry(0x10).nRef == 0;
     }));
@@ -356,46 +348,15 @@ TEST_F(Lock, TrapsAtTheDirectory)
 {
     fs::create_directory("/tmp/elsewhere");
     ASSERT_EQ(::chmod("/tmp/elsewhere", 0700), 0);
-    const struct {
-        const char *what;
-        std::function<bool()> plant;
-    } rows[] = {
-        {"link",
-         [] {
-             return ::symlink("/tmp/elsewhere", "/tmp/lock") == 0;
-         }},
-        {"dangling link",
-         [] {
-             return ::symlink("/tmp/nowhere", "/tmp/lock") == 0;
-         }},
-        {"file",
-         [] {
-             return std::ofstream("/tmp/lock").is_open();
-         }},
-        {"FIFO",
-         [] {
-             return ::mkfifo("/tmp/lock", 0666) == 0;
-         }},
-        {"open directory",
-         [] {
-             return ::mkdir("/tmp/lock", 0) == 0 && ::chmod("/tmp/lock", 01777) == 0;
-         }},
-        {"group's directory",
-         [] {
-             return ::mkdir("/tmp/lock", 0) == 0 && ::chmod("/tmp/lock", 0775) == 0;
-         }},
-        {"foreign directory",
-         [] {
-             return ::mkdir("/tmp/lock", 0755) == 0 && ::chown("/tmp/lock", 1000, 0) == 0;
-         }},
-    };
-    for (const auto &row : rows) {
-        ASSERT_TRUE(row.plant()) << row.what;
+    for (const char *plant :
+         {"ln -s /tmp/elsewhere /tmp/lock", "ln -s /tmp/nowhere /tmp/lock", ": >/tmp/lock", "mkfifo /tmp/lock",
+          "mkdir -m 1777 /tmp/lock", "mkdir -m 775 /tmp/lock", "mkdir /tmp/lock && chown 1000 /tmp/lock"}) {
+        ASSERT_EQ(std::system(plant), 0) << plant;
         test::ForgetFault();
-        EXPECT_EQ(ErrTLIBFileLock(0x806, 0), -1) << row.what;
-        EXPECT_EQ(LastFault(), (Fault{ERR_CREATE_FAILED, "lock_check_dir", 37})) << row.what;
-        EXPECT_TRUE(fs::is_empty("/tmp/elsewhere")) << row.what;
-        EXPECT_FALSE(fs::exists("/tmp/nowhere")) << row.what;
+        EXPECT_EQ(ErrTLIBFileLock(0x806, 0), -1) << plant;
+        EXPECT_EQ(LastFault(), (Fault{ERR_CREATE_FAILED, "lock_check_dir", 37})) << plant;
+        EXPECT_TRUE(fs::is_empty("/tmp/elsewhere")) << plant;
+        EXPECT_FALSE(fs::exists("/tmp/nowhere")) << plant;
         fs::remove_all("/tmp/lock");
     }
     struct stat st;
@@ -406,41 +367,16 @@ TEST_F(Lock, TrapsAtTheDirectory)
 
 TEST_F(Lock, TrapsAtALockFile)
 {
-    const char *const path = "/tmp/lock/lock_pw";
     std::ofstream("/tmp/victim") << "kept";
-    const struct {
-        const char *what;
-        std::function<bool()> plant;
-    } rows[] = {
-        {"link",
-         [&] {
-             return ::symlink("/tmp/victim", path) == 0;
-         }},
-        {"dangling link",
-         [&] {
-             return ::symlink("/tmp/nologin", path) == 0;
-         }},
-        {"FIFO",
-         [&] {
-             return ::mkfifo(path, 0644) == 0;
-         }},
-        {"directory",
-         [&] {
-             return ::mkdir(path, 0755) == 0;
-         }},
-        {"foreign file",
-         [&] {
-             return std::ofstream(path).is_open() && ::chown(path, 1000, 0) == 0;
-         }},
-    };
-    for (const auto &row : rows) {
+    for (const char *plant : {"ln -s /tmp/victim lock_pw", "ln -s /tmp/nologin lock_pw", "mkfifo lock_pw",
+                              "mkdir lock_pw", ": >lock_pw && chown 1000 lock_pw"}) {
         fs::remove_all("/tmp/lock");
         ASSERT_EQ(::mkdir("/tmp/lock", 0755), 0);
-        ASSERT_TRUE(row.plant()) << row.what;
+        ASSERT_EQ(std::system(("cd /tmp/lock && " + std::string(plant)).c_str()), 0) << plant;
         test::ForgetFault();
-        EXPECT_EQ(ErrTLIBFileLock(0x806, 0), -1) << row.what;
-        EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "lock_check_dir", 45})) << row.what;
-        EXPECT_FALSE(fs::exists("/tmp/nologin")) << row.what;
+        EXPECT_EQ(ErrTLIBFileLock(0x806, 0), -1) << plant;
+        EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "lock_check_dir", 45})) << plant;
+        EXPECT_FALSE(fs::exists("/tmp/nologin")) << plant;
     }
     EXPECT_EQ(fs::file_size("/tmp/victim"), 4u);
     fs::remove("/tmp/victim");

@@ -2,6 +2,7 @@
 #include "tavo_net.h"
 
 #include "network/card_record.h"
+#include "support/container_text.h"
 #include "support/fault_state.h"
 #include "support/scenario.h"
 #include "support/scratch_dir.h"
@@ -124,10 +125,7 @@ TEST_F(Kernel, HasTheNameTheMtuAndTheServers)
         EXPECT_EQ(card.nMtu, 1400);
         EXPECT_EQ(TAVONetSetMTUEth("eth7", 1400), -1);
         EXPECT_EQ(TLIBErrGet(), ERR_OP_FAILURE);
-        TLIBSZLIST *servers = PslTLIBSzListAlloc(512);
-        TLIBSzListPush(&servers, "192.0.2.53");
-        EXPECT_EQ(TAVONetDNSSet(servers), 0);
-        TLIBSzListFree(servers);
+        EXPECT_EQ(TAVONetDNSSet(test::MakeList({"192.0.2.53"}).get()), 0);
         return true;
     }));
     EXPECT_EQ(here_->Output("cat /etc/resolv.conf"), "nameserver\t192.0.2.53\n");
@@ -144,13 +142,9 @@ TEST_F(Kernel, SpeaksIPv6AsItWasTold)
         EXPECT_EQ(TAVONetIPv6AddrAdd("eth0", "2001:db8::20", 64), 0);
         EXPECT_EQ(TAVONetIPv6AddrAdd("eth0", "2001:db8::20", 64), -1) << "it has it";
         const auto addresses = [] {
-            TLIBSZLIST *list = PslTLIBSzListAlloc(512);
-            std::vector<std::string> found;
-            EXPECT_GE(TAVONetIPv6AddrEnum("eth0", &list), 0);
-            for (int i = 0; i < list->nItem; ++i)
-                found.push_back(SzTLIBSzListGet(list, i));
-            TLIBSzListFree(list);
-            return found;
+            test::List list = test::MakeList({});
+            EXPECT_GE(test::Moving(list, [](auto **addr) { return TAVONetIPv6AddrEnum("eth0", addr); }), 0);
+            return test::Items(list.get());
         };
         EXPECT_THAT(addresses(), Contains("2001:db8::20/64"));
         EXPECT_EQ(TAVONetIPv6RouteAdd("eth0", "2001:db8:1::", 48, "2001:db8::1"), 0);

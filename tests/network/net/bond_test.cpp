@@ -2,6 +2,7 @@
 #include "tavo_net.h"
 
 #include "cards.h"
+#include "support/container_text.h"
 
 #include <csignal>
 #include <cstdio>
@@ -258,12 +259,10 @@ TEST_F(Bond, IsReadFromTheKernel)
     ASSERT_EQ(record.nMember, 2);
     EXPECT_STREQ(record.rgszMember[1], "eth1");
 
-    TLIBSZLIST *list = PslTLIBSzListAlloc(512);
-    EXPECT_EQ(TAVONetLinkAggrEnum(&list), 1);
-    EXPECT_EQ(TAVONetLinkAggrPhyGet("bond0", &list), 2);
-    EXPECT_STREQ(SzTLIBSzListGet(list, 0), "bond0");
-    EXPECT_STREQ(SzTLIBSzListGet(list, 2), "eth1");
-    TLIBSzListFree(list);
+    test::List list = test::MakeList({});
+    EXPECT_EQ(test::Moving(list, TAVONetLinkAggrEnum), 1);
+    EXPECT_EQ(test::Moving(list, [](auto **addr) { return TAVONetLinkAggrPhyGet("bond0", addr); }), 2);
+    EXPECT_THAT(test::Items(list.get()), ElementsAre("bond0", "eth0", "eth1"));
 
     KernelHas("balance-rr 0\n", "");
     EXPECT_EQ(TAVONetLinkAggrGet("bond0", &record), -1);

@@ -3,6 +3,7 @@
 
 #include "cards.h"
 #include "network/named_process.h"
+#include "support/container_text.h"
 #include "support/hostile_names.h"
 #include "support/recorded_commands.h"
 
@@ -161,15 +162,16 @@ TEST_F(NetIPv6, AddressesComeFromTheKernelsTable)
                                     "zz800000000000000000000000000b01 03 40 20 80     eth0\n"
                                     "fe80 03 40 20 80     eth0\n"
                                     "fe800000000000000000000000000b01 03 ff 20 80     eth0\n");
-    TLIBSZLIST *list = PslTLIBSzListAlloc(512);
-    EXPECT_EQ(TAVONetIPv6AddrEnum("eth0", &list), 2);
-    EXPECT_STREQ(SzTLIBSzListGet(list, 0), "2001:db8::1/64");
-    EXPECT_STREQ(SzTLIBSzListGet(list, 1), "fe80::a01/64");
+    test::List list = test::MakeList({});
+    const auto enumerate = [&](const char *interface) {
+        return test::Moving(list, [=](auto **addr) { return TAVONetIPv6AddrEnum(interface, addr); });
+    };
+    EXPECT_EQ(enumerate("eth0"), 2);
+    EXPECT_THAT(test::Items(list.get()), ElementsAre("2001:db8::1/64", "fe80::a01/64"));
     tree_.Remove("/proc/net/if_inet6");
-    EXPECT_EQ(TAVONetIPv6AddrEnum("eth0", &list), 0);
-    EXPECT_EQ(TAVONetIPv6AddrEnum("../eth0", &list), -1);
+    EXPECT_EQ(enumerate("eth0"), 0);
+    EXPECT_EQ(enumerate("../eth0"), -1);
     EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
-    TLIBSzListFree(list);
 }
 
 TEST_F(NetIPv6, ACardIsToldWhatWakesTheAppliance)

@@ -4,6 +4,7 @@
 #include "cards.h"
 #include "network/card_record.h"
 #include "network/named_process.h"
+#include "support/container_text.h"
 #include "support/hostile_names.h"
 #include "support/recorded_commands.h"
 
@@ -20,6 +21,8 @@ using test::Card;
 using test::Cards;
 using test::CommandReply;
 using test::LastFault;
+using test::List;
+using test::MakeList;
 using test::Quiet;
 using test::ReadFile;
 using test::WriteFile;
@@ -252,39 +255,27 @@ TEST_F(NetSettings, AnUnknownRouteTableIsSaidSo)
         ElementsAre(MatchesRegex("net_default_gateway_get \\([0-9]+\\) Unknow kernel routing table format, errno=.*")));
 }
 
-class ServerList {
-  public:
-    explicit ServerList(const std::vector<const char *> &items = {})
-    {
-        for (const char *item : items)
-            TLIBSzListPush(&list_, item);
-    }
-    ~ServerList() { TLIBSzListFree(list_); }
-
-    TLIBSZLIST *list_ = PslTLIBSzListAlloc(512);
-};
-
 TEST_F(NetSettings, NameServersGoThroughALink)
 {
     std::filesystem::create_directories("/var/ns");
     std::filesystem::remove("/etc/resolv.conf");
     std::filesystem::create_symlink("/var/ns/resolv", "/etc/resolv.conf");
     WriteFile("/var/ns/resolv", "nameserver 198.51.100.9\n");
-    const ServerList two({"192.0.2.053", "2001:db8::1"});
+    const List two = MakeList({"192.0.2.053", "2001:db8::1"});
     test::ForgetFault();
-    ASSERT_EQ(TAVONetDNSSet(two.list_), 0);
+    ASSERT_EQ(TAVONetDNSSet(two.get()), 0);
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
     EXPECT_EQ(ReadFile("/var/ns/resolv"), "nameserver\t192.0.2.53\nnameserver\t2001:db8::1\n");
     EXPECT_TRUE(std::filesystem::is_symlink("/etc/resolv.conf"));
 
-    ServerList found;
-    EXPECT_EQ(TAVONetDNSGet(&found.list_), 2);
-    EXPECT_STREQ(SzTLIBSzListGet(found.list_, 1), "2001:db8::1");
+    List found = MakeList({});
+    EXPECT_EQ(test::Moving(found, TAVONetDNSGet), 2);
+    EXPECT_THAT(test::Items(found.get()), ElementsAre("192.0.2.53", "2001:db8::1"));
 
     for (const char *bad : {"127.0.0.1", "ns.example.com", "1.2.3.4\nsearch x", "fe80::1%eth0", ""}) {
         log_.Clear();
-        const ServerList list({"192.0.2.1", bad});
-        EXPECT_EQ(TAVONetDNSSet(list.list_), -1) << bad;
+        const List list = MakeList({"192.0.2.1", bad});
+        EXPECT_EQ(TAVONetDNSSet(list.get()), -1) << bad;
         EXPECT_EQ(LastFault(), (test::Fault{ERR_INVALID_NETNAME, "net_dns_set"}));
         EXPECT_THAT(log_.Texts(), ElementsAre(HasSubstr(") Bad DNS ")));
     }
@@ -461,11 +452,11 @@ TEST_F(NetSettings, HostileNamesAreRefused)
         Fill(bond.szBond, name);
         TAVONETLINKAGGR member = {"bond0", TAVO_NET_AGGR_BACKUP, 0, 1, {}, {}};
         Fill(member.rgszMember[0], name);
-        const ServerList servers({text});
+        const List servers = MakeList({name});
         const int results[] = {
             TAVONetSetCard1(&card, nullptr),     TAVONetSetCard1(&address, nullptr),
             TAVONetDefaultGatewaySet(text),      TAVOLnxSetHostname(text),
-            TAVONetDNSSet(servers.list_),        TAVONetSetMTUValue(text, 1500),
+            TAVONetDNSSet(servers.get()),        TAVONetSetMTUValue(text, 1500),
             TAVONetSetMTUEth(text, 1500),        TAVOConfGetMTUValue(text, buffer, sizeof buffer),
             TAVOIIpConflict(text, "192.0.2.11"), TAVOIIpConflict("eth0", text),
             TAVONetLinkAggrSet(&bond),           TAVONetLinkAggrSet(&member),

@@ -3,8 +3,7 @@
 
 #include "service_root.h"
 
-#include "tavo_list.h"
-
+#include "support/container_text.h"
 #include "support/fault_state.h"
 #include "support/scratch_dir.h"
 
@@ -27,13 +26,10 @@ namespace {
 
 std::vector<std::string> NamesOnVolume(const char *volume)
 {
-    TLIBSZLIST *list = PslTLIBSzListAlloc(512);
-    std::vector<std::string> names;
-    EXPECT_EQ(TAVOServiceGetbyVolume(volume, &list), list->nItem);
-    for (int i = 0; i < list->nItem; ++i)
-        names.emplace_back(SzTLIBSzListGet(list, i));
-    TLIBSzListFree(list);
-    return names;
+    test::List list = test::MakeList({});
+    const int count = test::Moving(list, [&](auto **addr) { return TAVOServiceGetbyVolume(volume, addr); });
+    EXPECT_EQ(count, list->nItem);
+    return test::Items(list.get());
 }
 
 TEST_F(Services, SwitchedAllTogetherAreThoseThatAreEnabled)

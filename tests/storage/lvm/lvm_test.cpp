@@ -3,6 +3,7 @@
 
 #include "support/captured_log.h"
 #include "support/captures.h"
+#include "support/container_text.h"
 #include "support/device_tree.h"
 #include "support/hostile_names.h"
 #include "support/recorded_calls.h"
@@ -15,22 +16,14 @@
 
 #include <unistd.h>
 
+using test::List;
+using test::MakeList;
 using testing::Contains;
 using testing::ElementsAre;
 using testing::IsEmpty;
 using testing::MatchesRegex;
 
 namespace {
-
-using List = std::unique_ptr<TLIBSZLIST, decltype(&TLIBSzListFree)>;
-
-List ListOf(const std::vector<std::string> &items)
-{
-    TLIBSZLIST *list = PslTLIBSzListAlloc(512);
-    for (const std::string &item : items)
-        TLIBSzListPush(&list, item.c_str());
-    return {list, TLIBSzListFree};
-}
 
 const std::string kPvs = "/sbin/pvs --noheading -o pv_name,vg_name,vg_uuid,pv_count --separator \"|\"";
 
@@ -151,7 +144,7 @@ TEST_F(Lvm, ChangesRunExactlyTheseCommands)
 
 TEST_F(Lvm, GroupIsTriedTwice)
 {
-    const List devices = ListOf({"/dev/md2", "/dev/md3"});
+    const List devices = MakeList({"/dev/md2", "/dev/md3"});
     const std::string marker = "/tmp/lvm_test_vgcreate";
     const std::string command = "/sbin/vgcreate /dev/vg1  /dev/md2 /dev/md3 > /dev/null 2>&1";
     ::unlink(marker.c_str());
@@ -172,7 +165,7 @@ TEST_F(Lvm, GroupIsTriedTwice)
 
 TEST_F(Lvm, CreateAllAtOnce)
 {
-    const List devices = ListOf({"/dev/md2", "/dev/md3"});
+    const List devices = MakeList({"/dev/md2", "/dev/md3"});
     commands_.OnCommand([](const std::string &command) -> test::CommandReply {
         return {0, command.starts_with("/sbin/vgs") ? std::string(test::Capture("vgs-lvm2-2.03")) : ""};
     });
@@ -267,7 +260,7 @@ TEST_F(Lvm, CleansDisksThatNobodyUses)
 TEST_F(Lvm, HostileNamesRunNothing)
 {
     ::unlink(test::kCanary);
-    const List good = ListOf({"/dev/md2"});
+    const List good = MakeList({"/dev/md2"});
     std::vector<std::string> names = test::HostileNames();
     for (const char *group :
          {"/dev/vg1 /etc", "/dev/vg/../../etc", "/dev/vg1;x", "/dev/vg1/lv", "/dev/vg..", "/dev/vg1\n"})
@@ -277,7 +270,7 @@ TEST_F(Lvm, HostileNamesRunNothing)
     char path[64];
     for (const std::string &text : names) {
         const char *const name = text.c_str();
-        const List bad = ListOf({text.empty() ? std::string("x") : text});
+        const List bad = MakeList({text.empty() ? std::string("x") : text});
         EXPECT_EQ(LVMPvCreate(name), -1) << name;
         EXPECT_EQ(LVMPvRemove(name), -1) << name;
         EXPECT_EQ(LVMPvSBGet(name, &pv), -1) << name;

@@ -133,7 +133,7 @@ TEST_F(MachineArrays, ALifeOfSixDisks)
         EXPECT_TRUE(HasSuperblock(member)) << member;
     EXPECT_EQ(StatusOf("/dev/md0"), RAID_STATUS_NORMAL);
 
-    EXPECT_EQ(RAIDRemoveMultiple(test::ListOf({"/dev/md0", "/dev/md7", "/dev/md1"}).get()), 0);
+    EXPECT_EQ(RAIDRemoveMultiple(test::MakeList({"/dev/md0", "/dev/md7", "/dev/md1"}).get()), 0);
     EXPECT_THAT(Told("cat /proc/mdstat"), testing::Not(HasSubstr("md")));
     for (const std::string &member : Partitions(1))
         EXPECT_FALSE(HasSuperblock(member)) << member;
@@ -254,7 +254,7 @@ TEST_F(MachineArrays, Raid5BecomesRaid6)
     Told("dd if=/dev/urandom of=/dev/md2 bs=1M count=64 conv=fsync");
     const std::string sum = Told("head -c 64M /dev/md2 | md5sum");
     const Array array = ReadArray("/dev/md2");
-    EXPECT_EQ(RAIDMigrate2RAID6(array.get(), test::ListOf({"/dev/sdd"}).get()), 0);
+    EXPECT_EQ(RAIDMigrate2RAID6(array.get(), test::MakeList({"/dev/sdd"}).get()), 0);
     EXPECT_EQ(ReadArray("/dev/md2")->fLevel, RAID_LEVEL_6);
     EXPECT_TRUE(BecomesNormal("/dev/md2"));
     EXPECT_EQ(ReadArray("/dev/md2")->nSlot, 4);
@@ -263,7 +263,7 @@ TEST_F(MachineArrays, Raid5BecomesRaid6)
     Told("mdadm -q /dev/md2 --fail /dev/sda --fail /dev/sdb && echo 3 >/proc/sys/vm/drop_caches");
     EXPECT_EQ(StatusOf("/dev/md2"), RAID_STATUS_DEGRADED);
     EXPECT_EQ(Told("head -c 64M /dev/md2 | md5sum"), sum);
-    EXPECT_EQ(RAIDMigrate2RAID6(ReadArray("/dev/md2").get(), test::ListOf({"/dev/sde"}).get()), -1);
+    EXPECT_EQ(RAIDMigrate2RAID6(ReadArray("/dev/md2").get(), test::MakeList({"/dev/sde"}).get()), -1);
 }
 
 TEST_F(MachineArrays, RoomOnTheMembersIsSeen)

@@ -2,6 +2,7 @@
 #ifndef TESTS_STORAGE_MACHINE_REAL_STORAGE_H
 #define TESTS_STORAGE_MACHINE_REAL_STORAGE_H
 
+#include "support/container_text.h"
 #include "support/eventually.h"
 #include "support/machine.h"
 
@@ -29,16 +30,7 @@ class StorageTest : public MachineTest {
     }
 };
 
-using List = std::unique_ptr<TLIBSZLIST, decltype(&TLIBSzListFree)>;
 using Array = std::unique_ptr<RAIDINFO, decltype(&RAIDInfoFree)>;
-
-inline List ListOf(const std::vector<std::string> &items)
-{
-    TLIBSZLIST *list = PslTLIBSzListAlloc(512);
-    for (const std::string &item : items)
-        TLIBSzListPush(&list, item.c_str());
-    return {list, TLIBSzListFree};
-}
 
 // Empty where there is no such array.
 inline Array ReadArray(const std::string &path)
@@ -79,7 +71,7 @@ struct Making {
 
 inline int Make(const Making &making)
 {
-    const List members = ListOf(making.members);
+    const List members = MakeList(making.members);
     RAIDREQUEST request = {};
     request.szPath = making.path.c_str();
     request.fLevel = making.level;

@@ -40,7 +40,7 @@ TEST_F(MachineVolumes, AreMadeRenamedExpandedAndRemoved)
     EXPECT_EQ(LVMVgSBGet("/dev/vg1", &group), 0);
 
     char uuid[256] = "";
-    ASSERT_EQ(LVMCreate(test::ListOf({"/dev/md2", "/dev/md3"}).get(), "/dev/vg1", "lv", uuid, sizeof uuid), 0);
+    ASSERT_EQ(LVMCreate(test::MakeList({"/dev/md2", "/dev/md3"}).get(), "/dev/vg1", "lv", uuid, sizeof uuid), 0);
     EXPECT_THAT(PhysicalVolumes(), ElementsAre("/dev/md2 /dev/vg1", "/dev/md3 /dev/vg1"));
     ASSERT_EQ(LVMVgSBGet("/dev/vg1", &group), 1);
     EXPECT_STREQ(group.szUuid, uuid);
@@ -109,7 +109,7 @@ TEST_F(MachineVolumes, ADevicesVolumeGoesWithItsMountedSnapshots)
 TEST_F(MachineVolumes, StrayPhysicalVolumesAreCleanedAndArraysAreNot)
 {
     ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .sync = false}), 0);
-    ASSERT_EQ(LVMCreate(test::ListOf({"/dev/md2"}).get(), "/dev/vg1", "lv", nullptr, 0), 0);
+    ASSERT_EQ(LVMCreate(test::MakeList({"/dev/md2"}).get(), "/dev/vg1", "lv", nullptr, 0), 0);
     Told("pvcreate -q /dev/sdc /dev/sdd /dev/sde && vgcreate -q vg7 /dev/sdd && lvcreate -q -W n -l100%VG -n lv vg7");
     // One that is mounted stays.
     Told("vgcreate -q vg8 /dev/sde && lvcreate -q -W n -l100%VG -n lv vg8 && mkfs.ext4 -q /dev/vg8/lv && mount "

@@ -4,6 +4,7 @@
 #include "support/appliance_root.h"
 #include "support/captured_log.h"
 #include "support/captures.h"
+#include "support/container_text.h"
 #include "support/device_tree.h"
 #include "support/fault_state.h"
 #include "support/hostile_names.h"
@@ -335,14 +336,11 @@ TEST_F(Partitions, Paths)
     tree_.Put("/proc/partitions", test::Capture("proc_partitions_md_lvm-linux-6.1-armmp-lpae"));
     Model("");
     const auto list_of = [](const char *prefix, int containers) {
-        TLIBSZLIST *list = PslTLIBSzListAlloc(512);
-        TLIBSzListPush(&list, "/dev/zero");
-        TLIBSzListPush(&list, "/dev/a");
+        test::List list = test::MakeList({"/dev/zero", "/dev/a"});
         const PARTITIONFILTER filter = {prefix, containers};
-        EXPECT_EQ(PartitionPathEnum(&filter, &list), list->nItem);
-        std::vector<std::string> paths(list->pszItem, list->pszItem + list->nItem);
-        TLIBSzListFree(list);
-        return paths;
+        const int count = test::Moving(list, [&](auto **addr) { return PartitionPathEnum(&filter, addr); });
+        EXPECT_EQ(count, list->nItem);
+        return test::Items(list.get());
     };
     EXPECT_THAT(list_of("sdf", 0), ElementsAre("/dev/a", "/dev/sdf", "/dev/sdf1", "/dev/sdf2", "/dev/zero"));
     EXPECT_EQ(list_of(nullptr, 0).size(), 31u) << "the heading is no partition";
@@ -352,19 +350,21 @@ TEST_F(Partitions, Paths)
                 testing::Contains(MatchesRegex("partition_path_enum:[0-9]+ Failed to parsing device: md0")));
     EXPECT_EQ(list_of(nullptr, 1).size(), 2u + 23u);
     log_.Clear();
-    TLIBSZLIST *list = PslTLIBSzListAlloc(512);
+    test::List list = test::MakeList({});
     const PARTITIONFILTER any = {nullptr, 0};
+    const auto enumerate = [&](auto **addr) {
+        return PartitionPathEnum(&any, addr);
+    };
     tree_.Put("/proc/partitions", "");
-    EXPECT_EQ(PartitionPathEnum(&any, &list), -1);
+    EXPECT_EQ(test::Moving(list, enumerate), -1);
     EXPECT_THAT(log_.Texts(),
                 ElementsAre(MatchesRegex("partition_path_enum:[0-9]+ There's no line in /proc/partitions")));
     log_.Clear();
     tree_.Put("/proc/partitions", "8 0 5 sda x\n   8 0 5 sdb");
-    EXPECT_EQ(PartitionPathEnum(&any, &list), 1);
+    EXPECT_EQ(test::Moving(list, enumerate), 1);
     EXPECT_STREQ(list->pszItem[0], "/dev/sdb") << "also without a newline at its end";
     EXPECT_THAT(log_.Texts(),
                 ElementsAre(MatchesRegex(".* Unexpected line: \\[8 0 5 sda x.*\\]. Counts of token is \\[5\\]")));
-    TLIBSzListFree(list);
 }
 
 TEST_F(Partitions, SpecialDevices)

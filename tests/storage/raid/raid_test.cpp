@@ -3,6 +3,7 @@
 
 #include "support/captured_log.h"
 #include "support/captures.h"
+#include "support/container_text.h"
 #include "support/device_tree.h"
 #include "support/fault_state.h"
 #include "support/hostile_names.h"
@@ -22,6 +23,8 @@
 #include <syslog.h>
 #include <unistd.h>
 
+using test::List;
+using test::MakeList;
 using testing::Contains;
 using testing::ElementsAre;
 using testing::IsEmpty;
@@ -30,15 +33,6 @@ using testing::MatchesRegex;
 namespace {
 
 using Info = std::unique_ptr<RAIDINFO, decltype(&RAIDInfoFree)>;
-using List = std::unique_ptr<TLIBSZLIST, decltype(&TLIBSzListFree)>;
-
-List ListOf(const std::vector<std::string> &items)
-{
-    TLIBSZLIST *list = PslTLIBSzListAlloc(512);
-    for (const std::string &item : items)
-        TLIBSzListPush(&list, item.c_str());
-    return {list, TLIBSzListFree};
-}
 
 struct FakeDisk {
     int number, major, minor, state;
@@ -264,11 +258,9 @@ TEST_F(Raid, EnumByNumber)
         tree_.Put(std::string("/sys/block/") + name + "/md/array_state",
                   name == std::string("md7") ? "clear\n" : "clean\n");
     tree_.Put("/dev/md10", "");
-    TLIBSZLIST *paths = PslTLIBSzListAlloc(512);
-    EXPECT_EQ(RAIDPathEnum(&paths), 3);
-    EXPECT_THAT(std::vector<std::string>(paths->pszItem, paths->pszItem + paths->nItem),
-                ElementsAre("/dev/md2", "/dev/md5", "/dev/md10"));
-    TLIBSzListFree(paths);
+    List paths = MakeList({});
+    EXPECT_EQ(test::Moving(paths, RAIDPathEnum), 3);
+    EXPECT_THAT(test::Items(paths.get()), ElementsAre("/dev/md2", "/dev/md5", "/dev/md10"));
     RAIDLIST *list = nullptr;
     EXPECT_EQ(RAIDInfoEnum(&list), 2) << "md2 has no node";
     EXPECT_EQ(RAIDListCount(list), 2);
@@ -350,7 +342,7 @@ TEST_F(Raid, WaitsForTheRebuild)
 
     calls_.Clear();
     log_.Clear();
-    const List paths = ListOf({"/dev/md7", "/dev/md5"});
+    const List paths = MakeList({"/dev/md7", "/dev/md5"});
     EXPECT_EQ(RAIDRebuildingMultiWait(paths.get()), -1);
     EXPECT_EQ(calls_.Calls().size(), 4u);
     EXPECT_THAT(log_.Texts(),
@@ -374,7 +366,7 @@ TEST_F(Raid, Superblocks)
     EXPECT_STREQ(superblock.szArray, "/dev/md5");
     EXPECT_EQ(RAIDSBGet("/dev/sdd", &superblock), 0);
     EXPECT_STREQ(superblock.szArray, "");
-    const List members = ListOf({"/dev/sdd", "/dev/sda3", "/dev/sdb"});
+    const List members = MakeList({"/dev/sdd", "/dev/sda3", "/dev/sdb"});
     RAIDSBENTRY *entries = nullptr;
     EXPECT_EQ(RAIDSBEnum(members.get(), &entries), 1);
     EXPECT_STREQ(entries->szMember, "/dev/sda3");
@@ -433,92 +425,48 @@ TEST_F(Raid, CreateRunsExactlyTheseCommands)
         int level, spare, slots;
         const RAIDVERSION *version;
         uint64_t bytes;
-        std::vector<std::string> members;
         int sync;
         const char *limit;
-        const char *command;
+        std::vector<std::string> members;
+        const char *words;  // of the command, up to the members
+        const char *missing;
     } rows[] = {
-        {4,
-         1,
-         3,
-         nullptr,
-         0,
-         {"/dev/sda3", "/dev/sdb3", "/dev/sdc3", "/dev/sdd3"},
-         1,
-         "",
-         "/sbin/mdadm -C /dev/md2 -e 1.1 -amd  -R -l5  -n3  -x1   /dev/sda3 /dev/sdb3 /dev/sdc3 /dev/sdd3 > /dev/null "
-         "2>&1"},
+        {4, 1, 3, nullptr, 0, 1, "", {"sda3", "sdb3", "sdc3", "sdd3"}, "-e 1.1 -amd  -R -l5  -n3  -x1  ", ""},
         {4,
          0,
          4,
          nullptr,
          1 << 20,
-         {"/dev/sda3", "/dev/sdb3", "/dev/sdc3"},
          0,
          "raidsizelimit=7\n",
-         "/sbin/mdadm -C /dev/md2 -e 1.1 -amd --assume-clean -R -l5  -n4  -x0 -z 1024  /dev/sda3 /dev/sdb3 /dev/sdc3 "
-         "missing"
-         " > /dev/null 2>&1"},
-        {2,
-         0,
-         1,
-         &old,
-         0,
-         {"/dev/sda1"},
-         1,
-         "raidsizelimit=7\n",
-         "/sbin/mdadm -C /dev/md2 -e 0.90 -amd  -R -l1 -f -n1  -x0 -z 7  /dev/sda1 > /dev/null 2>&1"},
-        {8,
-         0,
-         5,
-         nullptr,
-         0,
-         {"/dev/sda", "/dev/sdb", "/dev/sdc"},
-         1,
-         "",
-         "/sbin/mdadm -C /dev/md2 -e 1.1 -amd  -R -l6  -n5  -x0   /dev/sda /dev/sdb /dev/sdc missing missing > "
-         "/dev/null 2>&1"},
-        {1,
-         0,
-         2,
-         nullptr,
-         0,
-         {"/dev/sda3", "/dev/sdb3"},
-         0,
-         "",
-         "/sbin/mdadm -C /dev/md2 -e 1.1 -amd  -R -l0  -n2     /dev/sda3 /dev/sdb3 > /dev/null 2>&1"},
-        {32,
-         0,
-         1,
-         nullptr,
-         0,
-         {"/dev/sda3"},
-         0,
-         "",
-         "/sbin/mdadm -C /dev/md2 -e 1.1 -amd  -R -llinear -f -n1     /dev/sda3 > /dev/null 2>&1"},
-        {16,
-         0,
-         2,
-         nullptr,
-         0,
-         {"/dev/sda3", "/dev/sdb3"},
-         0,
-         "",
-         "/sbin/mdadm -C /dev/md2 -e 1.1 -amd --assume-clean -R -l10  -n2 -pn2    /dev/sda3 /dev/sdb3 > /dev/null "
-         "2>&1"},
+         {"sda3", "sdb3", "sdc3"},
+         "-e 1.1 -amd --assume-clean -R -l5  -n4  -x0 -z 1024 ",
+         " missing"},
+        {2, 0, 1, &old, 0, 1, "raidsizelimit=7\n", {"sda1"}, "-e 0.90 -amd  -R -l1 -f -n1  -x0 -z 7 ", ""},
+        {8, 0, 5, nullptr, 0, 1, "", {"sda", "sdb", "sdc"}, "-e 1.1 -amd  -R -l6  -n5  -x0  ", " missing missing"},
+        {1, 0, 2, nullptr, 0, 0, "", {"sda3", "sdb3"}, "-e 1.1 -amd  -R -l0  -n2    ", ""},
+        {32, 0, 1, nullptr, 0, 0, "", {"sda3"}, "-e 1.1 -amd  -R -llinear -f -n1    ", ""},
+        {16, 0, 2, nullptr, 0, 0, "", {"sda3", "sdb3"}, "-e 1.1 -amd --assume-clean -R -l10  -n2 -pn2   ", ""},
     };
     for (const auto &row : rows) {
         tree_.Put("/etc.defaults/tavoinfo.conf", row.limit);
-        const List members = ListOf(row.members);
+        std::vector<std::string> paths;
+        std::string command = std::string("/sbin/mdadm -C /dev/md2 ") + row.words;
+        for (const std::string &member : row.members) {
+            paths.push_back("/dev/" + member);
+            command += " " + paths.back();
+        }
+        command += std::string(row.missing) + " > /dev/null 2>&1";
+        const List members = MakeList(paths);
         const RAIDREQUEST request = {"/dev/md2", row.version, row.level,     row.spare,
                                      row.slots,  row.bytes,   members.get(), row.sync};
         commands_.Clear();
         EXPECT_EQ(RAIDCreate(&request), 0);
-        EXPECT_THAT(commands_.Commands(), ElementsAre(row.command));
+        EXPECT_THAT(commands_.Commands(), ElementsAre(command));
     }
     commands_.Clear();
     log_.Clear();
-    const List one = ListOf({"/dev/sda3"});
+    const List one = MakeList({"/dev/sda3"});
     const struct {
         const char *path;
         int spare, slots, line;
@@ -532,7 +480,7 @@ TEST_F(Raid, CreateRunsExactlyTheseCommands)
         EXPECT_EQ(RAIDCreate(&request), -1);
         EXPECT_EQ(log_.Texts().back(), "raid_create:" + std::to_string(row.line) + " Bad parameters");
     }
-    const List three = ListOf({"/dev/sda3", "/dev/sdb3", "/dev/sdc3"});
+    const List three = MakeList({"/dev/sda3", "/dev/sdb3", "/dev/sdc3"});
     RAIDREQUEST request = {"/dev/md2", nullptr, 2, 0, 2, 0, three.get(), 1};
     EXPECT_EQ(RAIDCreate(&request), -1);
     EXPECT_EQ(log_.Texts().back(), "raid_create:54 Bad parameters");
@@ -687,13 +635,13 @@ TEST_F(Raid, MigratesToRaid6)
 {
     calls_.OnIoctl(Put(6, 3));
     const RAIDINFO info = Record(RAID_LEVEL_5);
-    const List two = ListOf({"/dev/sdd3", "/dev/sde3"});
+    const List two = MakeList({"/dev/sdd3", "/dev/sde3"});
     EXPECT_EQ(RAIDMigrate2RAID6(&info, two.get()), 0);
     EXPECT_THAT(commands_.Commands(), ElementsAre("/bin/echo raid6  > /sys/block/md5/md/level",
                                                   "/sbin/mdadm /dev/md5 -a /dev/sdd3 > /dev/null 2>&1",
                                                   "/sbin/mdadm /dev/md5 -a /dev/sde3 > /dev/null 2>&1",
                                                   "/sbin/mdadm --grow /dev/md5 -n 1 >/dev/null 2>&1\n"));
-    const List one = ListOf({"/dev/sdd3"});
+    const List one = MakeList({"/dev/sdd3"});
     commands_.Clear();
     EXPECT_EQ(RAIDMigrate2RAID6(&info, one.get()), 0);
     EXPECT_EQ(commands_.Commands().size(), 2u);
@@ -711,7 +659,7 @@ TEST_F(Raid, RemoveStopsAndCleans)
             return {0, std::string(test::Capture("mdadm_E_1.2_raid5-mdadm-4.2"))};
         return {0, ""};
     });
-    const List paths = ListOf({"/dev/md9", "/dev/md5"});
+    const List paths = MakeList({"/dev/md9", "/dev/md5"});
     EXPECT_EQ(RAIDRemoveMultiple(paths.get()), 0);
     EXPECT_THAT(commands_.Commands(),
                 ElementsAre("/sbin/mdadm -E /dev/sda3 2>/dev/null", "/sbin/mdadm -S /dev/md5 > /dev/null 2>&1",
@@ -732,7 +680,7 @@ TEST_F(Raid, HostileNamesRunNothing)
         const char *const name = text.c_str();
         RAIDINFO bad = info;
         bad.szPath[text.copy(bad.szPath, sizeof bad.szPath - 1)] = 0;
-        const List list = ListOf({text.empty() ? std::string("x") : text});
+        const List list = MakeList({text.empty() ? std::string("x") : text});
         const RAIDREQUEST by_path = {name, nullptr, 2, 0, 1, 0, list.get(), 1};
         const RAIDREQUEST by_member = {"/dev/md2", nullptr, 2, 0, 1, 0, list.get(), 1};
         EXPECT_EQ(RAIDInfoGet(name, &read), -1) << name;

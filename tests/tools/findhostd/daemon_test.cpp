@@ -5,6 +5,7 @@
 #include "tavo_proc.h"
 
 #include "support/appliance_root.h"
+#include "support/container_text.h"
 #include "support/eventually.h"
 #include "support/scratch_dir.h"
 #include "support/virtual_cable.h"
@@ -65,17 +66,11 @@ std::vector<std::string> Discover(size_t expected, int *result = nullptr)
     const int dumped = TAVOFHOSTDumpHost();
     if (result)
         *result = dumped;
-    TLIBSZHASH *hosts = PshTLIBSzHashAlloc(1024);
+    test::Hash hosts(PshTLIBSzHashAlloc(1024));
+    test::Moving(hosts, TAVOFHOSTGet2Hash);
     std::vector<std::string> keys;
-    if (TAVOFHOSTGet2Hash(&hosts) > 0) {
-        TLIBSZLIST *names = PslTLIBSzListAlloc(1024);
-        TLIBSzHashEnumKey(hosts, &names);
-        for (int i = 0; i < names->nItem; ++i)
-            keys.push_back(SzTLIBSzListGet(names, i));
-        TLIBSzListFree(names);
-    }
-    TLIBSzHashFree(hosts);
-    std::sort(keys.begin(), keys.end());
+    for (const auto &[key, address] : test::Pairs(hosts.get()))
+        keys.push_back(key);
     return keys;
 }
 
