@@ -1,7 +1,7 @@
 // Rings when a child of this process ends.
 #include "core/detail/child_bell.h"
 
-#include "core/detail/child_process.h"
+#include "core/detail/child_status.h"
 #include "core/detail/owner.h"
 
 #include <algorithm>

@@ -1,6 +1,7 @@
 // Runs a composed command line through the shell and hands out its standard output line by line.
 #include "core/detail/command_output.h"
 
+#include "core/detail/child_process.h"
 #include "core/detail/run_command.h"
 
 #include <cstring>

@@ -7,7 +7,7 @@
 #ifndef TAVO_CORE_DETAIL_COMMAND_OUTPUT_H
 #define TAVO_CORE_DETAIL_COMMAND_OUTPUT_H
 
-#include "core/detail/child_process.h"
+#include "core/detail/child_status.h"
 #include "core/detail/owner.h"
 
 #include <optional>

@@ -2,6 +2,7 @@
 #include "core/detail/run_command.h"
 
 #include "core/detail/child_process.h"
+#include "core/detail/child_status.h"
 
 #include <string_view>
 #include <vector>

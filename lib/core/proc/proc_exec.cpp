@@ -3,6 +3,7 @@
 
 #include "core/detail/argument_list.h"
 #include "core/detail/child_process.h"
+#include "core/detail/child_status.h"
 #include "core/detail/fault.h"
 #include "core/detail/path_only_environment.h"
 

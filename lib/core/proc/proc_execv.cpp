@@ -2,6 +2,7 @@
 #include "tavo_proc.h"
 
 #include "core/detail/child_process.h"
+#include "core/detail/child_status.h"
 
 #include <unistd.h>
 

@@ -1,0 +1,41 @@
+// A file beside another one, which it is to replace.
+#ifndef TAVO_CORE_DETAIL_TEMP_FILE_H
+#define TAVO_CORE_DETAIL_TEMP_FILE_H
+
+#include "core/detail/open_file.h"
+
+#include <string>
+
+namespace tavo {
+
+// A file that is to take another one's place. Unless it does, it is removed again.
+class TempFile {
+  public:
+    TempFile() = default;
+    ~TempFile() { Remove(); }
+    TempFile(const TempFile &) = delete;
+    TempFile &operator=(const TempFile &) = delete;
+
+    // Creates the target's path followed by a dot and six random characters, mode 0600.
+    bool CreateBeside(const std::string &target);
+
+    // Takes over a file that the caller created.
+    void Adopt(Fd fd, std::string path);
+
+    int Descriptor() const noexcept { return fd_.Get(); }
+    const std::string &Path() const noexcept { return path_; }
+
+    // Closes; false when the kernel could not take everything.
+    bool Close() noexcept { return fd_.Close(); }
+
+    bool RenameTo(const std::string &target) noexcept;
+    void Remove() noexcept;
+
+  private:
+    Fd fd_;
+    std::string path_;  // empty when there is no file to remove
+};
+
+}  // namespace tavo
+
+#endif
