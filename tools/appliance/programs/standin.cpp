@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <csignal>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <string>
 #include <vector>
@@ -77,6 +78,43 @@ void LoseArguments()
         std::perror("standin: kernel thread");
 }
 
+// Goes on in a process of its own. The first one ends when that closes its descriptors: who starts a daemon sees its pid
+// file, unless it is a late one.
+void Detach()
+{
+    int ready[2];
+    if (::pipe2(ready, 0) != 0)
+        std::exit(1);
+    if (::fork() != 0) {
+        char byte;
+        ::close(ready[1]);
+        static_cast<void>(::read(ready[0], &byte, 1) == 0);
+        std::exit(0);
+    }
+    ::setsid();
+}
+
+void CloseDescriptors()
+{
+    const int null = ::open("/dev/null", O_RDWR);
+    for (int i = 0; i < 3; ++i)
+        ::dup2(null, i);
+    ::close_range(3, ~0U, 0);
+}
+
+// Until it is told to end.
+void LogSignals(const std::string &name, const sigset_t &all, bool stubborn)
+{
+    for (;;) {
+        int number = 0;
+        if (sigwait(&all, &number) != 0)
+            continue;
+        Log(name, "signal " + std::to_string(number));
+        if (number == SIGTERM && !stubborn)
+            return;
+    }
+}
+
 }  // namespace
 
 int main(int argc, char **argv)
@@ -103,16 +141,7 @@ int main(int argc, char **argv)
     sigset_t all;
     sigfillset(&all);
     sigprocmask(SIG_SETMASK, &all, nullptr);
-    int ready[2];
-    if (::pipe2(ready, 0) != 0)
-        return 1;
-    if (::fork() != 0) {  // who starts a daemon sees its pid file, unless it is a late one
-        char byte;
-        ::close(ready[1]);
-        static_cast<void>(::read(ready[0], &byte, 1) == 0);
-        return 0;
-    }
-    ::setsid();
+    Detach();
     const std::string own = std::to_string(::getpid());
     Log(name, "start " + own);
     Write(folder + name + ".pid", own + "\n");
@@ -124,23 +153,12 @@ int main(int argc, char **argv)
         LoseArguments();
     if (!has("late"))
         write_pid_file();
-    const int null = ::open("/dev/null", O_RDWR);
-    for (int i = 0; i < 3; ++i)
-        ::dup2(null, i);
-    ::close_range(3, ~0U, 0);
+    CloseDescriptors();
     if (has("late")) {
         ::usleep(1500000);
         write_pid_file();
     }
-
-    for (;;) {
-        int number = 0;
-        if (sigwait(&all, &number) != 0)
-            continue;
-        Log(name, "signal " + std::to_string(number));
-        if (number == SIGTERM && !has("stubborn"))
-            break;
-    }
+    LogSignals(name, all, has("stubborn"));
     if (!pid_file.empty())
         ::unlink(pid_file.c_str());
     ::unlink((folder + name + ".pid").c_str());

@@ -163,6 +163,67 @@ void FillPlace(const Request &request, const std::string &kept, const std::strin
     }
 }
 
+// The private copy with everything that is mounted in it. Adds what is lacking to the list.
+void BuildPlace(const Request &request, const std::string &kept, const std::string &place, std::string *lacks)
+{
+    // A machine may allow namespaces and still refuse these two; tried here, where the other form is still possible.
+    MountOrRefuse("proc", place, MS_NOSUID | MS_NODEV | MS_NOEXEC, nullptr);
+    MountOrRefuse("tmpfs", place, MS_NODEV, (std::string(size_limit) + ",mode=755").c_str());
+    if (!kept.empty())
+        Mount(kept.c_str(), place, nullptr, MS_BIND, nullptr);
+    FillPlace(request, kept, place);
+    Mount("proc", place + "/proc", "proc", MS_NOSUID | MS_NODEV | MS_NOEXEC, nullptr);
+    if (::mount("sysfs", (place + "/sys").c_str(), "sysfs", MS_RDONLY | MS_NOSUID | MS_NODEV | MS_NOEXEC, nullptr) != 0)
+        *lacks += ",sys";
+    MakeDevices(place);
+    for (const Bind &bind : request.binds) {
+        MakeParents(place, bind.to);
+        MakePlaceFor(bind.from, place + bind.to);
+        BindMount(bind.from, place + bind.to, bind.writable);
+    }
+}
+
+// Whether the command must be started through the emulator, because the kernel does not do so by itself.
+bool BringEmulator(const Request &request, bool own_users, const std::string &place, std::string *lacks)
+{
+    if (request.emulator.empty())
+        return false;
+    const std::string inner = place + "/run/emulator";
+    MakePlaceFor(request.emulator, inner);
+    BindMount(request.emulator, inner, false);
+    *lacks += ",setns";  // the emulator has threads, and only a process without them may change its mounts
+    if (own_users && RegisterEmulator(place, request.emulator))
+        return false;
+    *lacks += ",foreign-exec";
+    return true;
+}
+
+void MoveInto(const std::string &place)
+{
+    Must(::chdir(place.c_str()) == 0 && ::syscall(SYS_pivot_root, ".", ".") == 0, "move to", place);
+    Must(::umount2(".", MNT_DETACH) == 0 && ::chdir("/") == 0, "leave", "the old root");
+    Must(::sethostname("tavo", 4) == 0, "set", "the host name");
+    RaiseLoopback();
+}
+
+bool AreFewIdsMapped()
+{
+    std::FILE *map = std::fopen("/proc/self/uid_map", "re");
+    unsigned count = 0;
+    const bool few = map && std::fscanf(map, "%*u %*u %u", &count) == 1 && count < 65535;
+    if (map)
+        std::fclose(map);
+    return few;
+}
+
+// Whoever looks for a process by its command line must not find this one, which names them all.
+void LoseArguments(const Request &request)
+{
+    std::memset(request.arguments, 0, request.arguments_size);
+    std::strncpy(request.arguments, "init", request.arguments_size);
+    ::prctl(PR_SET_NAME, "init", 0, 0, 0);
+}
+
 // Process 1 of the new namespaces: makes the place, moves in, runs the command, reports.
 [[noreturn]] void Inside(const Request &request, bool own_users, const std::string &kept, int report)
 {
@@ -173,53 +234,19 @@ void FillPlace(const Request &request, const std::string &kept, const std::strin
     ::prctl(PR_SET_PDEATHSIG, SIGKILL, 0, 0, 0);
     MountOrRefuse(nullptr, "/", MS_REC | MS_PRIVATE, nullptr);
     const std::string place = request.root + "/mnt";
-    // A machine may allow namespaces and still refuse these two; tried here, where the other form is still possible.
-    MountOrRefuse("proc", place, MS_NOSUID | MS_NODEV | MS_NOEXEC, nullptr);
-    MountOrRefuse("tmpfs", place, MS_NODEV, (std::string(size_limit) + ",mode=755").c_str());
-    if (!kept.empty())
-        Mount(kept.c_str(), place, nullptr, MS_BIND, nullptr);
-
     std::string lacks = "mknod";
-    FillPlace(request, kept, place);
-    Mount("proc", place + "/proc", "proc", MS_NOSUID | MS_NODEV | MS_NOEXEC, nullptr);
-    if (::mount("sysfs", (place + "/sys").c_str(), "sysfs", MS_RDONLY | MS_NOSUID | MS_NODEV | MS_NOEXEC, nullptr) != 0)
-        lacks += ",sys";
-    MakeDevices(place);
-    for (const Bind &bind : request.binds) {
-        MakeParents(place, bind.to);
-        MakePlaceFor(bind.from, place + bind.to);
-        BindMount(bind.from, place + bind.to, bind.writable);
-    }
-    bool emulate = false;
-    if (!request.emulator.empty()) {
-        const std::string inner = place + "/run/emulator";
-        MakePlaceFor(request.emulator, inner);
-        BindMount(request.emulator, inner, false);
-        emulate = !own_users || !RegisterEmulator(place, request.emulator);
-        lacks += emulate ? ",setns,foreign-exec" : ",setns";  // the emulator has threads: it may not change its mounts
-    }
+    BuildPlace(request, kept, place, &lacks);
+    const bool emulate = BringEmulator(request, own_users, place, &lacks);
     if (!own_users) {
         lacks += ",user";
         const std::string settings = place + "/proc/sys";
         BindMount(settings, settings, false);
         DropCapabilities(false);
     }
-
-    Must(::chdir(place.c_str()) == 0 && ::syscall(SYS_pivot_root, ".", ".") == 0, "move to", place);
-    Must(::umount2(".", MNT_DETACH) == 0 && ::chdir("/") == 0, "leave", "the old root");
-    Must(::sethostname("tavo", 4) == 0, "set", "the host name");
-    RaiseLoopback();
-    std::FILE *map = std::fopen("/proc/self/uid_map", "re");
-    unsigned count = 0;
-    if (map && std::fscanf(map, "%*u %*u %u", &count) == 1 && count < 65535)
+    MoveInto(place);
+    if (AreFewIdsMapped())
         lacks += ",uids";
-    if (map)
-        std::fclose(map);
-
-    // Whoever looks for a process by its command line must not find this one, which names them all.
-    std::memset(request.arguments, 0, request.arguments_size);
-    std::strncpy(request.arguments, "init", request.arguments_size);
-    ::prctl(PR_SET_NAME, "init", 0, 0, 0);
+    LoseArguments(request);
 
     const pid_t command = ::fork();
     Must(command >= 0, "start", request.command[0]);
