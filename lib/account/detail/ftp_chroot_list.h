@@ -1,14 +1,21 @@
-// The users whom the FTP service keeps in their home folder: /etc/ftpchroot, one name a line.
+// The FTP service's list of users that it keeps in their home folder: /etc/ftpchroot, one name a line.
 #ifndef TAVO_ACCOUNT_DETAIL_FTP_CHROOT_LIST_H
 #define TAVO_ACCOUNT_DETAIL_FTP_CHROOT_LIST_H
 
-#include <string>
+#include "account/detail/name_lines.h"
 
 namespace tavo {
 
-// When the old name is in the list (in any case), it goes and the new one is added. False when the list cannot be
-// rewritten; true also when there is none.
-bool RenameInFtpChrootList(const std::string &old_name, const std::string &new_name);
+class FtpChrootList {
+  public:
+    // A name that stands there goes, and the new one comes at the end. False when the list cannot be read.
+    bool Rename(const std::string &old_name, const std::string &new_name);
+
+    bool Store() { return names_.Store(0644); }
+
+  private:
+    NameLines names_{"/etc/ftpchroot"};
+};
 
 }  // namespace tavo
 

@@ -3,15 +3,26 @@
 #ifndef TAVO_ACCOUNT_DETAIL_NET_BACKUP_USERS_H
 #define TAVO_ACCOUNT_DETAIL_NET_BACKUP_USERS_H
 
-#include <string>
+#include "account/detail/name_lines.h"
 
 namespace tavo {
 
-// Keeps the credentials of an authorised user in step: `old_name` empty for an added one, `password` in clear text, or
-// nullptr when it did not change. A rename also renames in the list of those authorised.
-bool SetNetBackupUser(const std::string &old_name, const std::string &name, const char *password);
+class NetBackupUsers {
+  public:
+    // Keeps the credentials of an authorised user in step: `old_name` empty for an added one, `password` in clear text,
+    // or nullptr when it did not change. A rename also renames in the list of those authorised.
+    // False when a file cannot be read.
+    bool Set(const std::string &old_name, const std::string &name, const char *password);
 
-bool RemoveNetBackupUser(const std::string &name);
+    bool Remove(const std::string &name);
+
+    // Writes what has changed. False when that fails.
+    bool Store();
+
+  private:
+    NameLines authorised_{"/usr/tavo/etc/netbkp.users"};
+    NameLines secrets_{"/etc/rsyncd.secrets"};
+};
 
 }  // namespace tavo
 

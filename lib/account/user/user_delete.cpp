@@ -83,9 +83,12 @@ void RemoveFromLists(const std::vector<Doomed> &doomed)
         LogError("%s:%d Delete users in smb.conf failed. tavoerr=0x%04X", tavoerrno);
     if (TAVOUserModifyGroup(names.Get()) != 0)
         LogError("%s:%d Delete users in groups failed. tavoerr=0x%04X", tavoerrno);
+    tavo::NetBackupUsers backup;
     for (const Doomed &user : doomed)
-        if (!tavo::RemoveNetBackupUser(user.name))
+        if (!backup.Remove(user.name))
             LogError("%s:%d Failed to remove the network backup credentials of [%s]", user.name);
+    if (!backup.Store())
+        LogError("%s:%d Failed to store the network backup credentials, errno=%d", errno);
 }
 
 void RemoveFolders(const std::vector<Doomed> &doomed)

@@ -63,22 +63,28 @@ void FollowGuest(const tavo::DoneUser &user)
 void FollowUp(const std::vector<tavo::DoneUser> &done)
 {
     const bool homes = tavo::SettingIsYes(tavo::kSettings, "userHomeEnable");
-    const bool backup = tavo::SettingIsYes(tavo::kFactorySettings, "netbkp");
+    const bool has_backup = tavo::SettingIsYes(tavo::kFactorySettings, "netbkp");
     RenameEverywhere(done);
     for (const tavo::DoneUser &user : done)
         FollowGuest(user);
+    tavo::NetBackupUsers backup;
     for (const tavo::DoneUser &user : done)
-        if (backup && !tavo::SetNetBackupUser(user.old_name, user.name, user.new_password ? user.password : nullptr))
+        if (has_backup && !backup.Set(user.old_name, user.name, user.new_password ? user.password : nullptr))
             LogError("%s:%d Failed to set the network backup credentials of [%s]", user.name);
+    if (!backup.Store())
+        LogError("%s:%d Failed to store the network backup credentials, errno=%d", errno);
     for (const tavo::DoneUser &user : done) {
         if (homes && user.IsAdded() && !tavo::CreateHome(user))
             LogError("%s:%d Failed to create the home folder of [%s], errno=%d", user.name, errno);
         if (homes && user.IsRenamed() && !tavo::MoveHome(user.old_name, user.name))
             LogError("%s:%d Failed to move the home folder of [%s], errno=%d", user.old_name, errno);
     }
+    tavo::FtpChrootList ftp;
     for (const tavo::DoneUser &user : done)
-        if (user.IsRenamed() && !tavo::RenameInFtpChrootList(user.old_name, user.name))
+        if (user.IsRenamed() && !ftp.Rename(user.old_name, user.name))
             LogError("%s:%d Failed to rename [%s] in the FTP chroot list", user.old_name);
+    if (!ftp.Store())
+        LogError("%s:%d Failed to store the FTP chroot list, errno=%d", errno);
 }
 
 // True when the stores can still be trusted.

@@ -389,7 +389,24 @@ TEST(UserStore, DisksThatFail)
     }
 }
 
-// How often a batch waits for the disk does not depend on its size.
+// Every other file of the appliance that knows these users by name.
+void NameThemEverywhere(const std::vector<std::string> &names)
+{
+    std::string samba = "[share]\n\tvalid users = ";
+    std::string lines;
+    std::string secrets;
+    for (const std::string &name : names) {
+        samba += name + ", ";
+        lines += name + "\n";
+        secrets += name + ":secret\n";
+    }
+    test::WriteFile("/usr/tavo/etc/smb.conf", samba + "admin\n");
+    test::WriteFile("/etc/ftpchroot", lines + "admin\n");
+    test::WriteFile("/usr/tavo/etc/netbkp.users", lines + "admin\n");
+    test::WriteFile("/etc/rsyncd.secrets", secrets + "root:secret\n", 0600);
+}
+
+// How often a batch waits for the disk does not depend on its size, but on how many files there are to change.
 TEST(UserStore, SyncsOfABatch)
 {
     std::vector<std::string> names;
@@ -436,6 +453,10 @@ TEST(UserStore, SyncsOfABatch)
         {"nothing new", [&] { return set(false, ""); }, 0},
         {"rename, also in the group", [&] { return set(false, "r"); }, 11},
         {"delete, also from the group", [&] { return remove("r"); }, 11},
+        {"add again", [&] { return set(true, ""); }, 9},
+        {"the group again", [&] { return TAVOGroupDelete(std::array{"staff"}.data(), 1) + join(); }, 4},
+        {"rename everywhere", [&] { return NameThemEverywhere(names), set(false, "r"); }, 19},
+        {"delete everywhere", [&] { return remove("r"); }, 17},
     };
     for (const auto &[what, change, most] : rows) {
         ASSERT_TRUE(GetUser("root"));
@@ -444,6 +465,9 @@ TEST(UserStore, SyncsOfABatch)
         EXPECT_LE(syncs, most) << what;
         EXPECT_GE(syncs, most / 2) << what << ": who did not wait does not know";
     }
+    EXPECT_EQ(test::FileText("/usr/tavo/etc/netbkp.users") + test::FileText("/etc/rsyncd.secrets"),
+              "admin\nroot:secret\n");
+    EXPECT_EQ(test::LineOf("/etc/ftpchroot", "user7"), "") << "renamed there";
 }
 
 // The first of the four renames fails: nothing has happened. A later one fails: the next call finishes what was begun.

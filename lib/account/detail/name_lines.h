@@ -1,0 +1,40 @@
+// A file of another program whose lines begin with users' names: read when it is first asked for, and written once,
+// however many users change.
+#ifndef TAVO_ACCOUNT_DETAIL_NAME_LINES_H
+#define TAVO_ACCOUNT_DETAIL_NAME_LINES_H
+
+#include "core/detail/file_rewrite.h"
+
+#include <functional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace tavo {
+
+class NameLines {
+  public:
+    explicit NameLines(const char *path) : path_(path) {}
+
+    // False when the file is there and cannot be read. A missing one has no lines.
+    bool Read();
+
+    // What `change` makes of each line of `name`, line ends included; "" takes one out. True when there was one.
+    bool Change(const std::string &name, const std::function<std::string(std::string_view line)> &change);
+
+    void Append(const std::string &line);
+
+    // False when what changed could not be written.
+    bool Store(mode_t mode_of_new);
+
+  private:
+    const char *path_;
+    FileRewrite file_;
+    std::vector<std::string> lines_;
+    enum { kUnread, kRead, kUnreadable } state_ = kUnread;
+    bool changed_ = false;
+};
+
+}  // namespace tavo
+
+#endif
