@@ -89,19 +89,6 @@ TEST_F(FileRewriteTest, FollowsLinksAndKeepsThem)
     EXPECT_THAT(dir_.Names(), ElementsAre("chain", "dangling", "dirlink", "link", "loop", "real"));
 }
 
-TEST_F(FileRewriteTest, TrustsNoLinkWhereEverybodyMayPutOne)
-{
-    ASSERT_EQ(::mkdir((dir_ / "public").c_str(), 0755), 0);
-    ASSERT_EQ(::chmod((dir_ / "public").c_str(), 01777), 0);
-    test::WriteFile(dir_ / "victim", "precious");
-    ASSERT_EQ(::symlink((dir_ / "victim").c_str(), (dir_ / "public/trap").c_str()), 0);
-    ASSERT_EQ(::symlink((dir_ / "nologin").c_str(), (dir_ / "public/dangling").c_str()), 0);
-    EXPECT_EQ(Rewrite(dir_ / "public/trap", "x"), ERR_OPEN_FAILED);
-    EXPECT_EQ(Rewrite(dir_ / "public/dangling", "x"), ERR_OPEN_FAILED);
-    EXPECT_EQ(test::ReadFile(dir_ / "victim"), "precious");
-    EXPECT_THAT(dir_.Names(), ElementsAre("public", "victim"));
-}
-
 TEST_F(FileRewriteTest, RefusesWhatIsNoFile)
 {
     ASSERT_EQ(::mkfifo((dir_ / "fifo").c_str(), 0644), 0);

@@ -104,6 +104,7 @@ TEST_F(KeyValueTest, SetReplacesTheFirstAndDropsTheRest)
         {"", "key", "", nullptr, "key=\n"},
         {"key=old\n", "key", "a b", "%s=\"%s\"\n", "key=\"a b\"\n"},
         {"key=old\n", "key", "%n%s", "%%%s=%s\n", "%key=%n%s\n"},
+        {"key=old\n", "key", "50%d", "%s%s", "key50%d"},
         {"no sign\n[net]\n\tx = y \r\n", "key", "v", nullptr, "no sign\n[net]\n\tx = y \r\nkey=v\n"},
     };
     for (const Row &row : rows) {
@@ -146,11 +147,12 @@ TEST_F(KeyValueTest, WritersRefuseWhatCouldNotBeReadBack)
         const char *key, *value, *format;
     };
     constexpr Row rows[] = {
-        {nullptr, "v", nullptr},   {"key", nullptr, nullptr},  {"", "v", nullptr},        {"a=b", "v", nullptr},
-        {"#a", "v", nullptr},      {";a", "v", nullptr},       {"[a", "v", nullptr},      {" a", "v", nullptr},
-        {"a\t", "v", nullptr},     {"\"a\"", "v", nullptr},    {"a\nb", "v", nullptr},    {"key", "v\nb=c", nullptr},
-        {"key", "v\r", nullptr},   {"key", "v", "%s=%s%s\n"},  {"key", "v", "%s=%n%s\n"}, {"key", "v", "%s=\n"},
-        {"key", "v", "%s=%s\n%d"}, {"key", "v", "%s=%100s\n"},
+        {nullptr, "v", nullptr},     {"key", nullptr, nullptr},  {"", "v", nullptr},        {"a=b", "v", nullptr},
+        {"#a", "v", nullptr},        {";a", "v", nullptr},       {"[a", "v", nullptr},      {" a", "v", nullptr},
+        {"a\t", "v", nullptr},       {"\"a\"", "v", nullptr},    {"a\nb", "v", nullptr},    {"key", "v\nb=c", nullptr},
+        {"key", "v\r", nullptr},     {"key", "v", "%s=%s%s\n"},  {"key", "v", "%s=%n%s\n"}, {"key", "v", "%s=\n"},
+        {"key", "v", "%s=%s\n%d"},   {"key", "v", "%s=%100s\n"}, {"key", "v", ""},          {"key", "v", "%s=%ls\n"},
+        {"key", "v", "%1$s=%2$s\n"}, {"key", "v", "%s=%s%"},     {"k\r", "v", nullptr},
     };
     for (const Row &row : rows) {
         ForgetFault();

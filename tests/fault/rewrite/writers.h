@@ -24,69 +24,37 @@ inline const StringHash &NewPairs()
     return pairs;
 }
 
+#define WRITER(name, module, call)                                                                                     \
+    {                                                                                                                  \
+        name, module, [](const char *path) {                                                                           \
+            return call;                                                                                               \
+        }                                                                                                              \
+    }
+
 // Each gives 1 when it is done.
 inline constexpr Writer kRewriters[] = {
-    {"SetKeyValue", "file_set_key_value",
-     [](const char *path) {
-         return TLIBFileSetKeyValue(path, "key", "new", nullptr);
-     }},
-    {"RemoveKey", "file_remove_key",
-     [](const char *path) {
-         return TLIBFileRemoveKey(path, "key");
-     }},
-    {"SetKeys", "file_set_keys",
-     [](const char *path) {
-         return TLIBFileSetKeys(path, NewPairs().Get(), nullptr);
-     }},
-    {"SetLine", "file_set_line",
-     [](const char *path) {
-         return TLIBFileSetLine(path, 2, "key=x");
-     }},
-    {"SetLineByKey", "file_set_line_by_key",
-     [](const char *path) {
-         return TLIBFileSetLineByKey(path, "key", "key=y");
-     }},
-    {"AddLine", "file_add_line",
-     [](const char *path) {
-         return TLIBFileAddLine(path, 0, "end");
-     }},
-    {"AddLineByKey", "file_add_line_by_key",
-     [](const char *path) {
-         return TLIBFileAddLineByKey(path, "key", "before");
-     }},
-    {"ReplaceSubStr", "file_replace_sub_str",
-     [](const char *path) {
-         return TLIBFileReplaceSubStr(path, "old", "new");
-     }},
-    {"UTF8BomStrip", "file_utf8bom_strip",
-     [](const char *path) {
-         return TLIBFileUTF8BomStrip(path);
-     }},
-    {"SetSection", "file_modify_section",
-     [](const char *path) {
-         return ErrTLIBFileSetSection(path, "net", nullptr, NewPairs().Get(), 1, nullptr);
-     }},
-    {"RemoveSection", "file_modify_section",
-     [](const char *path) {
-         return ErrTLIBFileRemoveSection(path, "net");
-     }},
-    {"Comment", "file_comment",
-     [](const char *path) {
-         return TLIBFileComment(path, "key");
-     }},
+    WRITER("SetKeyValue", "file_set_key_value", TLIBFileSetKeyValue(path, "key", "new", nullptr)),
+    WRITER("RemoveKey", "file_remove_key", TLIBFileRemoveKey(path, "key")),
+    WRITER("SetKeys", "file_set_keys", TLIBFileSetKeys(path, NewPairs().Get(), nullptr)),
+    WRITER("SetLine", "file_set_line", TLIBFileSetLine(path, 2, "key=x")),
+    WRITER("SetLineByKey", "file_set_line_by_key", TLIBFileSetLineByKey(path, "key", "key=y")),
+    WRITER("AddLine", "file_add_line", TLIBFileAddLine(path, 0, "end")),
+    WRITER("AddLineByKey", "file_add_line_by_key", TLIBFileAddLineByKey(path, "key", "before")),
+    WRITER("ReplaceSubStr", "file_replace_sub_str", TLIBFileReplaceSubStr(path, "old", "new")),
+    WRITER("UTF8BomStrip", "file_utf8bom_strip", TLIBFileUTF8BomStrip(path)),
+    WRITER("SetSection", "file_modify_section",
+           ErrTLIBFileSetSection(path, "net", nullptr, NewPairs().Get(), 1, nullptr)),
+    WRITER("RemoveSection", "file_modify_section", ErrTLIBFileRemoveSection(path, "net")),
+    WRITER("Comment", "file_comment", TLIBFileComment(path, "key")),
 };
 
 // Each gives 1 when it is done.
 inline constexpr Writer kAppenders[] = {
-    {"AppendKey", "file_append_key",
-     [](const char *path) {
-         return TLIBFileAppendKey(path, "added", "v", nullptr);
-     }},
-    {"AddSection", "file_add_section",
-     [](const char *path) {
-         return ErrTLIBFileAddSection(path, "added", NewPairs().Get(), nullptr) + 1;
-     }},
+    WRITER("AppendKey", "file_append_key", TLIBFileAppendKey(path, "added", "v", nullptr)),
+    WRITER("AddSection", "file_add_section", ErrTLIBFileAddSection(path, "added", NewPairs().Get(), nullptr) + 1),
 };
+
+#undef WRITER
 
 }  // namespace test
 
