@@ -1,5 +1,6 @@
 // The appliance's partitioning tool, run on image files.
 #include "support/appliance_root.h"
+#include "support/running_program.h"
 #include "support/scratch_dir.h"
 
 #include <gmock/gmock.h>
@@ -10,18 +11,11 @@
 
 #include <fcntl.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 namespace {
 
 constexpr off_t kGiB = off_t{1} << 30;
-
-struct Result {
-    int status;
-    std::string output;
-    std::string error;
-};
 
 class Sfdisk : public testing::Test {
   protected:
@@ -40,26 +34,10 @@ class Sfdisk : public testing::Test {
     }
 
     // Runs it on the image.
-    Result Run(std::vector<std::string> words)
+    test::Ran Run(test::Words words)
     {
-        words.insert(words.begin(), "/sbin/sfdisk");
         words.push_back(image_);
-        const std::string output = dir_ / "output";
-        const std::string error = dir_ / "error";
-        const pid_t child = ::fork();
-        if (child == 0) {
-            ::dup2(::open(output.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600), 1);
-            ::dup2(::open(error.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600), 2);
-            std::vector<char *> argv;
-            for (std::string &word : words)
-                argv.push_back(word.data());
-            argv.push_back(nullptr);
-            ::execv(argv[0], argv.data());
-            ::_exit(127);
-        }
-        int status = 0;
-        ::waitpid(child, &status, 0);
-        return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, test::ReadFile(output), test::ReadFile(error)};
+        return test::RunningProgram("/sbin/sfdisk", words).Wait();
     }
 
     std::string Sector(off_t number = 0)
@@ -81,7 +59,7 @@ class Sfdisk : public testing::Test {
     // The list without the name of the image.
     std::string List(std::vector<std::string> words = {"-l", "-uS"})
     {
-        std::string text = Run(words).output;
+        std::string text = Run(words).out;
         for (size_t at; (at = text.find(image_)) != text.npos;)
             text.erase(at, image_.size());
         return text;
@@ -128,9 +106,9 @@ TEST_F(Sfdisk, MakesAndUnmakesTheLayoutOfASystemDisk)
     EXPECT_EQ(Run({"-N3", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0);
     EXPECT_EQ(Run({"-N3", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0) << "empty already";
     EXPECT_EQ(Run({"-N5", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 1) << "no such thing";
-    const Result absent = Run({"-l", "-uS", "-N3"});
+    const test::Ran absent = Run({"-l", "-uS", "-N3"});
     EXPECT_EQ(absent.status, 1);
-    EXPECT_EQ(absent.output + absent.error, "");
+    EXPECT_EQ(absent.out + absent.err, "");
     EXPECT_EQ(Sector().substr(478, 32), std::string(32, '\0'));
     struct stat facts;
     ASSERT_EQ(::stat(image_.c_str(), &facts), 0);
@@ -174,31 +152,31 @@ TEST_F(Sfdisk, RefusesWhatDoesNotFit)
     for (const auto &row : rows) {
         Resize(row.bytes);
         PutSector(0, table);
-        const Result result = Run(row.words);
+        const test::Ran result = Run(row.words);
         EXPECT_EQ(result.status, 1) << row.complaint;
-        EXPECT_THAT(result.error, testing::HasSubstr(row.complaint));
+        EXPECT_THAT(result.err, testing::HasSubstr(row.complaint));
         EXPECT_EQ(Sector(), table);
     }
     EXPECT_EQ(Run({"-N4", "-o108", "-z10", "-t83"}).status, 0) << "right behind it";
 
     PutSector(0, Table({SmallEntry(0xEE, 1, 255)}));
-    EXPECT_THAT(Run({"-N2", "-j1", "-z1", "-t83"}).error, testing::HasSubstr("GUID"));
+    EXPECT_THAT(Run({"-N2", "-j1", "-z1", "-t83"}).err, testing::HasSubstr("GUID"));
     PutSector(0, std::string(512, '\0'));
-    EXPECT_THAT(Run({"-N1", "-j1", "-z1", "-t83"}).error, testing::HasSubstr("no partition table"));
+    EXPECT_THAT(Run({"-N1", "-j1", "-z1", "-t83"}).err, testing::HasSubstr("no partition table"));
     EXPECT_EQ(Run({"-l"}).status, 1);
-    EXPECT_EQ(Run({"-l", "-N1"}).error, "") << "that a blank disk lacks a partition is an answer";
+    EXPECT_EQ(Run({"-l", "-N1"}).err, "") << "that a blank disk lacks a partition is an answer";
 }
 
 TEST_F(Sfdisk, TheRestOfALargeDiskEndsWhereNumbersEnd)
 {
     Resize(4096 * kGiB);
     ASSERT_EQ(Run({"-M1"}).status, 0);
-    const Result loud = Run({"-N1", "-j256", "-z-1", "-t83"});
+    const test::Ran loud = Run({"-N1", "-j256", "-z-1", "-t83"});
     EXPECT_EQ(loud.status, 0);
-    EXPECT_THAT(loud.error, testing::HasSubstr("2^32"));
+    EXPECT_THAT(loud.err, testing::HasSubstr("2^32"));
     EXPECT_EQ(List(), "1 256 4294967295 4294967040 83 Linux\n");
     EXPECT_EQ(Sector().substr(451, 3), "\xFE\xFF\xFF");
-    EXPECT_EQ(Run({"-N1", "-j256", "-z-1", "-t83", "-q"}).error, "");
+    EXPECT_EQ(Run({"-N1", "-j256", "-z-1", "-t83", "-q"}).err, "");
 }
 
 TEST_F(Sfdisk, RefusesWhatItDoesNotKnow)
@@ -233,9 +211,9 @@ TEST_F(Sfdisk, RefusesWhatItDoesNotKnow)
         {"-l", "/dev/null"},
     };
     for (const auto &words : lines) {
-        const Result result = Run(words);
+        const test::Ran result = Run(words);
         EXPECT_EQ(result.status, 2) << testing::PrintToString(words);
-        EXPECT_THAT(result.error, testing::StartsWith("sfdisk: "));
+        EXPECT_THAT(result.err, testing::StartsWith("sfdisk: "));
     }
     EXPECT_EQ(Sector(), before);
     EXPECT_EQ(Run({"--help"}).status, 0);

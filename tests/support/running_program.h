@@ -1,0 +1,48 @@
+// A program that a test runs, and what it said.
+#ifndef TESTS_SUPPORT_RUNNING_PROGRAM_H
+#define TESTS_SUPPORT_RUNNING_PROGRAM_H
+
+#include <ostream>
+#include <string>
+#include <vector>
+
+#include <sys/types.h>
+
+namespace test {
+
+using Words = std::vector<std::string>;
+
+struct Ran {
+    int status;  // 128 and the signal for a death by one
+    std::string out;
+    std::string err;
+};
+
+std::ostream &operator<<(std::ostream &out, const Ran &ran);
+
+int ShellStatus(int wait_status);
+
+// Its name is the last part of the path.
+[[noreturn]] void BecomeProgram(const std::string &path, const Words &words);
+
+// Still running. Its outputs are pipes.
+class RunningProgram {
+  public:
+    // It reads the input, which must fit into a pipe, as its standard input.
+    RunningProgram(const std::string &path, const Words &words, const std::string &input = {});
+    ~RunningProgram();  // waits for its end
+    RunningProgram(const RunningProgram &) = delete;
+    RunningProgram &operator=(const RunningProgram &) = delete;
+
+    pid_t Pid() const { return pid_; }
+    Ran Wait();
+
+  private:
+    pid_t pid_;
+    int out_;
+    int err_;
+};
+
+}  // namespace test
+
+#endif
