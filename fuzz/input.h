@@ -8,6 +8,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <string>
+#include <string_view>
 
 namespace fuzz {
 
@@ -46,6 +47,15 @@ class Input {
     const uint8_t *at_;
     size_t left_;
 };
+
+// The next field of an input that is text: fields end at a 0xFE byte.
+inline std::string TakeField(std::string_view &rest)
+{
+    const size_t end = rest.find('\xFE');
+    const std::string field(rest.substr(0, end));
+    rest.remove_prefix(end == rest.npos ? rest.size() : end + 1);
+    return field;
+}
 
 // A finding: says where and stops.
 inline void Check(bool right, const char *what, int line = __builtin_LINE())

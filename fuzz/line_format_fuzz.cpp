@@ -1,23 +1,18 @@
 // Line formats: what is accepted is what printf would make of two texts, and nothing else than "%s" and "%%" gets there.
 #include "core/detail/line_format.h"
+#include "input.h"
 #include "tavo_section.h"
 
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
 
+using fuzz::Check;
+
 namespace {
 
 constexpr const char *kKey = "key%n";
 constexpr const char *kValue = "a value of %s";
-
-void Check(bool right, const char *what)
-{
-    if (!right) {
-        std::fprintf(stderr, "%s\n", what);
-        std::abort();
-    }
-}
 
 // The slow and obvious way: take all "%%" out, then all "%s"; two of those and no other percent sign may be left.
 bool IsPlain(std::string format)

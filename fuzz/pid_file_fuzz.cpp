@@ -1,5 +1,6 @@
 // Pid files: what is read from any text is a process id that the text plainly spells, or nothing.
 #include "core/detail/pid_file.h"
+#include "input.h"
 
 #include <algorithm>
 #include <cstdint>
@@ -8,17 +9,11 @@
 #include <string>
 #include <string_view>
 
+using fuzz::Check;
+
 namespace {
 
 constexpr pid_t kLargest = 32768;
-
-void Check(bool right, const char *what)
-{
-    if (!right) {
-        std::fprintf(stderr, "%s\n", what);
-        std::abort();
-    }
-}
 
 // The slow and obvious way: cut the blanks off both ends of the first line, and compare with every spelling of the number.
 pid_t Expected(const std::string &text)

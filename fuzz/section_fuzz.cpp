@@ -4,6 +4,7 @@
 #include "core/detail/line_reader.h"
 #include "core/detail/list_owner.h"
 #include "core/detail/section_header.h"
+#include "input.h"
 #include "tavo_section.h"
 
 #include <cstdint>
@@ -14,23 +15,10 @@
 #include <string>
 #include <vector>
 
+using fuzz::Check;
+using fuzz::TakeField;
+
 namespace {
-
-void Check(bool right, const char *what)
-{
-    if (!right) {
-        std::fprintf(stderr, "%s\n", what);
-        std::abort();
-    }
-}
-
-std::string TakeField(std::string_view &rest)
-{
-    const size_t end = rest.find('\xFE');
-    const std::string field(rest.substr(0, end));
-    rest.remove_prefix(end == rest.npos ? rest.size() : end + 1);
-    return field;
-}
 
 // A file of this run, in a directory of its own: in memory, where a sync costs nothing.
 struct Scratch {

@@ -5,6 +5,7 @@
 #include "core/detail/line_reader.h"
 #include "core/detail/owner.h"
 #include "core/detail/settings_text.h"
+#include "input.h"
 #include "tavo_file.h"
 #include "tavo_str.h"
 
@@ -13,23 +14,10 @@
 
 #include <sys/mman.h>
 
+using fuzz::Check;
+using fuzz::TakeField;
+
 namespace {
-
-void Check(bool right, const char *what)
-{
-    if (!right) {
-        std::fprintf(stderr, "%s\n", what);
-        std::abort();
-    }
-}
-
-std::string TakeField(std::string_view &rest)
-{
-    const size_t end = rest.find('\xFE');
-    const std::string field(rest.substr(0, end));
-    rest.remove_prefix(end == rest.npos ? rest.size() : end + 1);
-    return field;
-}
 
 std::string Trimmed(std::string text)
 {
