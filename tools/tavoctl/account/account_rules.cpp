@@ -59,6 +59,24 @@ void RefuseTooMany(int additions, const std::string &attempted)
         throw Failure{.attempted = attempted, .code = ERR_TOO_MANY_USERS};
 }
 
+void DeleteAll(const std::vector<std::string> &names, int (*remove)(const char *const *, int),
+               bool (*is_there)(const std::string &), const std::string &attempted)
+{
+    std::vector<const char *> texts;
+    for (const std::string &name : names)
+        texts.push_back(name.c_str());
+    TLIBErrSet(ERR_SUCCESS);
+    const int result = remove(texts.data(), static_cast<int>(texts.size()));
+    Failure failure = LibraryFailure(attempted);
+    if (result != 0)
+        throw failure;
+    for (const std::string &name : names)
+        if (is_there(name)) {
+            failure.reason = name + " is still there";
+            throw failure;
+        }
+}
+
 bool ParseYesNo(const std::string &what, const std::string &text)
 {
     if (text != "yes" && text != "no")

@@ -3,6 +3,7 @@
 #define TAVOCTL_ACCOUNT_RULES_H
 
 #include <string>
+#include <vector>
 
 namespace tavoctl {
 
@@ -23,6 +24,11 @@ void RefuseTakenId(const std::string &name, int uid);
 
 // Throws a Failure when the model allows fewer than so many further accounts.
 void RefuseTooMany(int additions, const std::string &attempted);
+
+// Deletes accounts or groups by the library's function for that, in one batch. Throws a Failure when it fails, or when one
+// of them is there afterwards all the same.
+void DeleteAll(const std::vector<std::string> &names, int (*remove)(const char *const *, int),
+               bool (*is_there)(const std::string &), const std::string &attempted);
 
 bool ParseYesNo(const std::string &what, const std::string &text);
 

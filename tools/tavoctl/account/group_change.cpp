@@ -180,25 +180,17 @@ class GroupDelete : public Verb {
     int Run(const Call &call) override
     {
         std::string list;
-        std::vector<const char *> names;
         for (const std::string &name : names_) {
             const Group group = ReadGroup(name);
             if (IsSystemGroup(group) && !system_)
                 throw UsageFailure("delete the group " + name, "the system needs it", "say --system to do it");
             list += (list.empty() ? "" : ", ") + group.name;
-            names.push_back(name.c_str());
         }
         call.Confirm("Delete " + list + "?");
-        TLIBErrSet(ERR_SUCCESS);
-        const int result = TAVOGroupDelete(names.data(), static_cast<int>(names.size()));
-        Failure failure = LibraryFailure("delete " + list);
-        if (result != 0)
-            throw failure;
-        for (const std::string &name : names_)
-            if (FindGroup(name)) {
-                failure.reason = name + " is still there";
-                throw failure;
-            }
+        const auto is_there = [](const std::string &name) {
+            return FindGroup(name).has_value();
+        };
+        DeleteAll(names_, TAVOGroupDelete, is_there, "delete " + list);
         return exit_done;
     }
 

@@ -104,7 +104,24 @@ class UserAdd : public Verb {
     PasswordChoice password_;
 };
 
-class UserModify : public Verb {
+// A verb that changes an account that is there.
+class OneUser : public Verb {
+  public:
+    void Declare(Arguments &arguments) override { arguments.Text("NAME", name_, name_help, UserNames); }
+
+  protected:
+    template <class Edit>
+    void Change(const std::string &attempted, Edit edit) const
+    {
+        UserChange change = {.old_name = name_, .user = ReadUser(name_)};
+        edit(change.user);
+        SetUsers({change}, attempted);
+    }
+
+    std::string name_;
+};
+
+class UserModify : public OneUser {
   public:
     static constexpr VerbInfo info = {"modify", changes,
                                       "Changes facts of an account; what is not given stays. Its name is changed by "
@@ -114,7 +131,7 @@ class UserModify : public Verb {
 
     void Declare(Arguments &arguments) override
     {
-        arguments.Text("NAME", name_, name_help, UserNames);
+        OneUser::Declare(arguments);
         facts_.Declare(arguments);
     }
 
@@ -122,18 +139,15 @@ class UserModify : public Verb {
     {
         if (!facts_.Any())
             throw UsageFailure("change the user " + name_, "nothing to change was given");
-        UserChange change = {.old_name = name_, .user = ReadUser(name_)};
-        facts_.Apply(change.user);
-        SetUsers({change}, "change the user " + name_);
+        Change("change the user " + name_, [&](User &user) { facts_.Apply(user); });
         return exit_done;
     }
 
   private:
-    std::string name_;
     Facts facts_;
 };
 
-class UserRename : public Verb {
+class UserRename : public OneUser {
   public:
     static constexpr VerbInfo info = {"rename", changes,
                                       "Gives an account another name, also one that differs in case only. Id, "
@@ -142,7 +156,7 @@ class UserRename : public Verb {
 
     void Declare(Arguments &arguments) override
     {
-        arguments.Text("NAME", name_, name_help, UserNames);
+        OneUser::Declare(arguments);
         arguments.Text("NEW_NAME", new_name_, "its new name");
     }
 
@@ -151,15 +165,12 @@ class UserRename : public Verb {
         const std::string attempted = "rename the user " + name_ + " to " + new_name_;
         if (BlTLIBIsUserName(new_name_.c_str()) != 1)
             throw Failure{.attempted = attempted, .code = ERR_INVALID_USERNAME};
-        UserChange change = {.old_name = name_, .user = ReadUser(name_)};
-        change.user.name = new_name_;
-        SetUsers({change}, attempted);
+        Change(attempted, [&](User &user) { user.name = new_name_; });
         WarnOfName(new_name_);
         return exit_done;
     }
 
   private:
-    std::string name_;
     std::string new_name_;
 };
 
@@ -190,33 +201,19 @@ class UserDelete : public Verb {
             list += (list.empty() ? "" : ", ") + user.name;
         }
         call.Confirm("Delete " + list + ", with home folders?");
-        Delete("delete " + list);
+        const auto is_there = [](const std::string &name) {
+            return FindUser(name).has_value();
+        };
+        DeleteAll(names_, TAVOUserDelete, is_there, "delete " + list);
         return exit_done;
     }
 
   private:
-    void Delete(const std::string &attempted) const
-    {
-        std::vector<const char *> names;
-        for (const std::string &name : names_)
-            names.push_back(name.c_str());
-        TLIBErrSet(ERR_SUCCESS);
-        const int result = TAVOUserDelete(names.data(), static_cast<int>(names.size()));
-        Failure failure = LibraryFailure(attempted);
-        if (result != 0)
-            throw failure;
-        for (const std::string &name : names_)
-            if (FindUser(name)) {
-                failure.reason = name + " is still there";
-                throw failure;
-            }
-    }
-
     std::vector<std::string> names_;
     bool system_ = false;
 };
 
-class UserPasswd : public Verb {
+class UserPasswd : public OneUser {
   public:
     static constexpr VerbInfo info = {"passwd", changes,
                                       "Sets the password of an account, also for Samba. It is asked for, or is the "
@@ -226,7 +223,7 @@ class UserPasswd : public Verb {
 
     void Declare(Arguments &arguments) override
     {
-        arguments.Text("NAME", name_, name_help, UserNames);
+        OneUser::Declare(arguments);
         password_.Declare(arguments);
     }
 
@@ -234,20 +231,19 @@ class UserPasswd : public Verb {
     {
         ReadUser(name_);  // nobody is asked for a password in vain
         const std::string password = password_.For(name_);
-        UserChange change = {.old_name = name_, .user = ReadUser(name_)};
-        if (change.user.password == password && !password.empty())
-            throw UsageFailure("set the password of " + name_, "this is the hash of the one that is set");
-        change.user.password = password;
-        SetUsers({change}, "set the password of " + name_);
+        Change("set the password of " + name_, [&](User &user) {
+            if (user.password == password && !password.empty())
+                throw UsageFailure("set the password of " + name_, "this is the hash of the one that is set");
+            user.password = password;
+        });
         return exit_done;
     }
 
   private:
-    std::string name_;
     PasswordChoice password_;
 };
 
-class UserExpire : public Verb {
+class UserExpire : public OneUser {
   public:
     static constexpr VerbInfo info = {"expire", changes,
                                       "Sets the last day of an account, which is valid through that whole day, or "
@@ -257,21 +253,18 @@ class UserExpire : public Verb {
 
     void Declare(Arguments &arguments) override
     {
-        arguments.Text("NAME", name_, name_help, UserNames);
+        OneUser::Declare(arguments);
         arguments.Text("DATE", date_, "yyyy/mm/dd, or never");
     }
 
     int Run(const Call &) override
     {
         const int day = ParseExpiry(date_);
-        UserChange change = {.old_name = name_, .user = ReadUser(name_)};
-        change.user.expires = day;
-        SetUsers({change}, "set the last day of " + name_);
+        Change("set the last day of " + name_, [&](User &user) { user.expires = day; });
         return exit_done;
     }
 
   private:
-    std::string name_;
     std::string date_;
 };
 
