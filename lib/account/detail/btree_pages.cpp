@@ -13,7 +13,7 @@ namespace tavo {
 namespace {
 
 // The fields of the first page by their offsets.
-constexpr size_t kMagicAt = 12, kVersionAt = 16, kPageSizeAt = 20, kEncryptionAt = 24, kTypeAt = 25, kMetaFlagsAt = 26,
+constexpr size_t kMagicAt = 12, kVersionAt = 16, kPageSizeAt = 20, kEncryptionAt = 24, kMetaFlagsAt = 26,
                  kLastPageAt = 32, kFlagsAt = 48, kRootAt = 88, kMeta = 92;
 constexpr uint8_t kBtreeMetaType = 9;
 constexpr uint32_t kVersion = 9;
