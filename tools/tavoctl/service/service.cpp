@@ -154,6 +154,7 @@ void AddService(Program &program)
     service.Add<ServiceList>();
     service.Add<ServiceStatus>();
     AddServiceSwitches(service);
+    AddServiceVolumes(service);
 }
 
 }  // namespace tavoctl

@@ -7,6 +7,7 @@ namespace tavoctl {
 class Family;
 
 void AddServiceSwitches(Family &service);
+void AddServiceVolumes(Family &service);
 
 }  // namespace tavoctl
 

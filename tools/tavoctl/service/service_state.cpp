@@ -32,9 +32,9 @@ std::optional<bool> IsEnabled(const char *key)
 
 void AddFolders(ServiceState &state)
 {
-    for (const int32_t *id = TAVOServiceShareIDGet(state.id); *id != TAVO_SERVICE_SHARE_END; ++id) {
+    for (const int32_t folder : FoldersOf(state.id)) {
         TAVOSERVICESHARE share = {};
-        const bool there = TAVOServiceSettingGet(*id, &share) == 1;
+        const bool there = TAVOServiceSettingGet(folder, &share) == 1;
         state.bound = there && state.bound.value_or(true);
         state.shares.emplace_back(share.szShareName);
         const std::string volume = share.szVolumePath;
@@ -90,6 +90,14 @@ std::vector<std::string> ServiceNames()
     for (int id = 0; const char *name = TAVOServiceNameGet(id); ++id)
         names.emplace_back(name);
     return names;
+}
+
+std::vector<int32_t> FoldersOf(int id)
+{
+    std::vector<int32_t> folders;
+    for (const int32_t *folder = TAVOServiceShareIDGet(id); *folder != TAVO_SERVICE_SHARE_END; ++folder)
+        folders.push_back(*folder);
+    return folders;
 }
 
 std::vector<std::string> MountedVolumes()

@@ -2,6 +2,7 @@
 #ifndef TAVOCTL_SERVICE_STATE_H
 #define TAVOCTL_SERVICE_STATE_H
 
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <vector>
@@ -28,6 +29,9 @@ int FindService(const std::string &name);
 // The status of a service without a process of its own needs a look at its key under the settings lock; may_wait false
 // leaves it out.
 ServiceState StateOf(int id, bool may_wait = true);
+
+// The numbers of its data folders.
+std::vector<int32_t> FoldersOf(int id);
 
 // For completion.
 std::vector<std::string> ServiceNames();

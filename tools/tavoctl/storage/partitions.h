@@ -1,0 +1,21 @@
+// The partitions of a disk, and the verbs that change them.
+#ifndef TAVOCTL_PARTITIONS_H
+#define TAVOCTL_PARTITIONS_H
+
+#include <string>
+#include <vector>
+
+namespace tavoctl {
+
+class Family;
+
+int NumberOf(const std::string &partition);  // 3 of "/dev/sda3"
+
+// In the order of the kernel's list.
+std::vector<std::string> PartitionsOf(const std::string &disk);
+
+void AddPartitionChange(Family &partition);
+
+}  // namespace tavoctl
+
+#endif
