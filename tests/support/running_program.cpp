@@ -3,6 +3,7 @@
 
 #include <gtest/gtest.h>
 
+#include <csignal>
 #include <utility>
 
 #include <fcntl.h>
@@ -58,8 +59,10 @@ RunningProgram::RunningProgram(const std::string &path, const Words &words, cons
 
 RunningProgram::~RunningProgram()
 {
-    if (pid_ > 0)
-        Wait();
+    if (pid_ <= 0)
+        return;
+    ::kill(pid_, SIGKILL);
+    Wait();
 }
 
 Ran RunningProgram::Wait()

@@ -30,7 +30,7 @@ class RunningProgram {
   public:
     // It reads the input, which must fit into a pipe, as its standard input.
     RunningProgram(const std::string &path, const Words &words, const std::string &input = {});
-    ~RunningProgram();  // waits for its end
+    ~RunningProgram();  // kills it
     RunningProgram(const RunningProgram &) = delete;
     RunningProgram &operator=(const RunningProgram &) = delete;
 

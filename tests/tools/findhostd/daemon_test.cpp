@@ -118,7 +118,7 @@ TEST_F(Daemons, FindEachOther)
         }));
     }
     // A new name, and one that is switched off.
-    ASSERT_EQ(nodes_[0]->Shell("hostname attic"), 0);
+    ASSERT_TRUE(nodes_[0]->Run([] { return ::sethostname("attic", 5) == 0; }));
     ASSERT_EQ(nodes_[2]->Shell("ifconfig eth0 down"), 0);
     ::usleep(4100000);  // later, it is another query
     EXPECT_TRUE(nodes_[1]->Run([] {

@@ -20,7 +20,7 @@ class Case:
     detail: str = ''
     seconds: float = 0.0
     output: bytes = b''
-    alone: bool = False  # passed only in a process and a root of its own
+    alone: bool = False  # failed among others and had a process and a root of its own then
 
     @property
     def bad(self):
@@ -35,6 +35,8 @@ class Reader:
         self.current = None
         self.since = 0.0  # the last beginning or end of a case
         self.rest, self.outside = b'', b''
+        self.begun = 0
+        self.spoilt = False  # a case has failed, and not as the first: what comes after it need not be its own fault
 
     def feed(self, data):
         *lines, self.rest = (self.rest + data).split(b'\n')
@@ -51,6 +53,7 @@ class Reader:
         if begin and begin[1].decode() in self.cases:
             self.current, self.since = self.cases[begin[1].decode()], time.monotonic()
             self.current.output = b''
+            self.begun += 1
         elif self.current:
             # What a case prints without an end of line stands before its result.
             end = re.search(_END + re.escape(self.current.name.encode()) + rb'(, where .*)?( \(\d+ ms\))?\r?$', line)
@@ -64,6 +67,7 @@ class Reader:
 
     def close(self, verdict, detail=''):
         self.current.verdict, self.current.detail = verdict, detail
+        self.spoilt |= verdict == FAILED and self.begun > 1
         now = time.monotonic()
         self.current.seconds = now - self.since
         self.current, self.since = None, now
