@@ -27,6 +27,11 @@ bool NetBackupUsers::Set(const std::string &old_name, const std::string &name, c
         return true;
     if (!secrets_.Read())
         return false;
+    // A line end in the password would make a line of whatever follows it, such as somebody else's credentials.
+    if (password && std::string_view(password).find_first_of("\r\n") != std::string_view::npos) {
+        secrets_.Change(ServiceName(before), Nothing);
+        return false;
+    }
     const bool known = secrets_.Change(ServiceName(before), [&](std::string_view line) {
         const size_t colon = line.find(':');
         const std::string_view kept = colon == line.npos ? std::string_view(":\n") : line.substr(colon);

@@ -11,7 +11,7 @@ class NetBackupUsers {
   public:
     // Keeps the credentials of an authorised user in step: `old_name` empty for an added one, `password` in clear text,
     // or nullptr when it did not change. A rename also renames in the list of those authorised.
-    // False when a file cannot be read.
+    // False when a file cannot be read, or cannot hold the password: then there is none any more.
     bool Set(const std::string &old_name, const std::string &name, const char *password);
 
     bool Remove(const std::string &name);

@@ -124,6 +124,10 @@ TEST(UserSet, RefusalsLeaveTheFiles)
         {{}, {.name = "eve", .home = "/homes/../etc"}, ERR_BAD_PARAMETERS},
         {{}, {.name = "eve", .home = "homes"}, ERR_BAD_PARAMETERS},
         {{}, {.name = "eve", .home = "/" + huge}, ERR_BAD_PARAMETERS},
+        {{}, {.name = huge}, ERR_INVALID_USERNAME},
+        {{}, {.name = "eve", .shell = "/" + huge}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .shell = "/bin/../sh"}, ERR_BAD_PARAMETERS},
+        {{}, {.name = "eve", .mail = huge}, ERR_BAD_PARAMETERS},
         {{}, {.name = "eve", .shell = "/bin/sh:x"}, ERR_BAD_PARAMETERS},
         {{}, {.name = "eve", .shell = "/bin/sh\n"}, ERR_BAD_PARAMETERS},
         {{}, {.name = "eve", .mail = "a:b"}, ERR_BAD_PARAMETERS},
@@ -420,6 +424,13 @@ TEST(UserFollowUp, FoldersListsAndServices)
     EXPECT_EQ(test::ReadFile("/usr/tavo/etc/smb.conf"), "[s]\nvalid users = carol, @alice, bob\n");
     EXPECT_EQ(test::ReadFile("/etc/rsyncd.secrets"), "carol:pw\nother:secret\n");
     EXPECT_EQ(test::ReadFile("/usr/tavo/etc/netbkp.users"), "carol\nadmin\n");
+
+    // What would be another line of credentials is none, and the old password is no longer good.
+    const test::User carol = GetUser("carol");
+    TAVOUSER changed = *carol;
+    changed.szPasswd = const_cast<char *>("new\nother:known");
+    ASSERT_EQ(test::SetUser("carol", &changed), 0);
+    EXPECT_EQ(test::ReadFile("/etc/rsyncd.secrets"), "other:secret\n");
 
     // A renamed user never gets, or loses, a folder that is somebody else's.
     ASSERT_EQ(::mkdir("/volume1/homes/dave", 0700), 0);
