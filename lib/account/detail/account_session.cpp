@@ -33,7 +33,7 @@ int AccountSession::OpenToRead(std::span<const size_t> stores)
 {
     if (const int code = Lock(kind_.lock, TAVO_LOCK_SHARED))
         return code;
-    if (SealHolds(kind_.family) && OpenToFind(stores) == 0 && IsCurrent())
+    if (SealHolds(kind_.family) && Open(stores) == 0 && IsCurrent())
         return 0;
     stores_.clear();
     Unlock();
@@ -111,16 +111,6 @@ int AccountSession::Open(std::span<const size_t> stores)
         if (code != 0)
             return ERR_OPEN_FAILED;
     }
-    return 0;
-}
-
-int AccountSession::OpenToFind(std::span<const size_t> stores)
-{
-    stores_.clear();
-    stores_.resize(kind_.family.stores.size());
-    for (const size_t index : stores)
-        if (const int code = Btree::OpenToFind(kind_.family.stores[index].path, stores_[index]))
-            return code;
     return 0;
 }
 

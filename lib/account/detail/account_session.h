@@ -47,7 +47,6 @@ class AccountSession {
   private:
     int Lock(unsigned locks, unsigned mode);
     int Open(std::span<const size_t> stores);
-    int OpenToFind(std::span<const size_t> stores);
     int OpenSettled(std::span<const size_t> stores);
     bool IsCurrent() const;
 

@@ -117,27 +117,13 @@ int Btree::Open(const char *path, const Options &options, std::unique_ptr<Btree>
         break;
     }
     std::unique_ptr<Btree> store(new Btree(path, (options.flags & O_ACCMODE) == O_RDONLY));
-    if (const int code = store->OpenDatabase(options.flags & O_ACCMODE, options.info))
-        return code;
-    out = std::move(store);
-    return 0;
-}
-
-int Btree::OpenToFind(const char *path, std::unique_ptr<Btree> &out)
-{
-    std::unique_ptr<Btree> store(new Btree(path, true));
-    if (!store->pages_.Open(path))
-        return ERR_OPEN_FAILED;
-    out = std::move(store);
-    return 0;
-}
-
-int Btree::OpenDatabase(int flags, bool info)
-{
     BTREEINFO parameters = {};
     errno = 0;
-    pDb = ::dbopen(path_.c_str(), flags, 0, DB_BTREE, info ? &parameters : nullptr);
-    return pDb ? 0 : errno == EINVAL ? RemoveForeign(path_.c_str()) : OpenCode(errno);
+    store->pDb = ::dbopen(path, options.flags & O_ACCMODE, 0, DB_BTREE, options.info ? &parameters : nullptr);
+    if (!store->pDb)
+        return errno == EINVAL ? RemoveForeign(path) : OpenCode(errno);
+    out = std::move(store);
+    return 0;
 }
 
 Btree::~Btree()
@@ -146,16 +132,8 @@ Btree::~Btree()
     Close();
 }
 
-int Btree::Get(std::string_view key, std::string_view &value)
+int Btree::Get(std::string_view key, std::string_view &value) const
 {
-    if (!pDb) {
-        const BtreePages::Found found = pages_.Find(key, found_);
-        value = found_;
-        if (found != BtreePages::Found::kAskTheDatabase)
-            return found == BtreePages::Found::kYes ? 0 : int{ERR_KEY_NOT_FOUND};
-        if (const int code = OpenDatabase(O_RDONLY, true))
-            return code;
-    }
     const DBT wanted = Item(key);
     DBT found = {};
     const int result = Handle(this)->get(Handle(this), &wanted, &found, 0);
@@ -195,9 +173,6 @@ int Btree::Delete(std::string_view key)
 
 int Btree::Step(bool skip_reserved, std::string_view &key, std::string_view &value)
 {
-    if (!pDb)
-        if (const int code = OpenDatabase(O_RDONLY, true))
-            return code;
     for (;;) {
         const unsigned flag = SequenceFlag(nCursorType);
         DBT name = Item(key);
@@ -217,7 +192,7 @@ int Btree::Step(bool skip_reserved, std::string_view &key, std::string_view &val
     }
 }
 
-int Btree::GetNumber(std::string_view key, int32_t &value)
+int Btree::GetNumber(std::string_view key, int32_t &value) const
 {
     std::string_view bytes;
     if (const int code = Get(key, bytes))
@@ -235,8 +210,6 @@ int Btree::SetNumber(std::string_view key, int32_t value)
 
 int Btree::Flush()
 {
-    if (!pDb)
-        return 0;
     const NoStoreSync no_sync;
     return Handle(this)->sync(Handle(this), 0) == 0 ? 0 : CodeOf(errno, ERR_DB_STORE);
 }

@@ -3,7 +3,6 @@
 #ifndef TAVO_ACCOUNT_DETAIL_BTREE_H
 #define TAVO_ACCOUNT_DETAIL_BTREE_H
 
-#include "account/detail/btree_pages.h"
 #include "tavo_bdb.h"
 
 #include <memory>
@@ -27,10 +26,6 @@ class Btree : public TAVOBDB {
     // 0 and a handle, or an error code. A file that is no store has been deleted with ERR_DB_OPEN.
     static int Open(const char *path, const Options &options, std::unique_ptr<Btree> &out);
 
-    // A handle to find entries with. The database is opened when it is asked for more than that, or cannot be done
-    // without. 0, or ERR_OPEN_FAILED for what the database would have to look at.
-    static int OpenToFind(const char *path, std::unique_ptr<Btree> &out);
-
     // The handle behind a caller's pointer: every TAVOBDB comes from Open.
     static Btree *Of(TAVOBDB *handle) { return static_cast<Btree *>(handle); }
     static const Btree *Of(const TAVOBDB *handle) { return static_cast<const Btree *>(handle); }
@@ -40,7 +35,7 @@ class Btree : public TAVOBDB {
     Btree &operator=(const Btree &) = delete;
 
     // The views stay valid until the next call on this handle. Absent: ERR_KEY_NOT_FOUND.
-    int Get(std::string_view key, std::string_view &value);
+    int Get(std::string_view key, std::string_view &value) const;
     int Set(std::string_view key, std::string_view value);
     int Delete(std::string_view key);
 
@@ -48,7 +43,7 @@ class Btree : public TAVOBDB {
     int Step(bool skip_reserved, std::string_view &key, std::string_view &value);
 
     // A 32-bit value of a reserved key. ERR_DB_CURSOR when it is there but not four bytes long.
-    int GetNumber(std::string_view key, int32_t &value);
+    int GetNumber(std::string_view key, int32_t &value) const;
     int SetNumber(std::string_view key, int32_t value);
 
     int Flush();  // hands all pages to the file
@@ -62,11 +57,8 @@ class Btree : public TAVOBDB {
     {
     }
     bool NoteChange();  // false when nothing may be changed
-    int OpenDatabase(int flags, bool info);
 
     std::string path_;
-    BtreePages pages_;
-    std::string found_;  // the value that Get gives a view of, when the database was not asked
     std::set<std::string, std::less<>> deleted_;
     bool read_only_;
     bool changed_ = false;

@@ -1,16 +1,40 @@
 // Recognises and creates the files of the stores.
 #include "account/detail/btree_file.h"
 
-#include "account/detail/btree_pages.h"
 #include "account/detail/store_sync.h"
 #include "core/detail/open_file.h"
 
+#include <bit>
+#include <cstdint>
+#include <cstring>
 #include <string>
 
 #include <db_185.h>
 
 namespace tavo {
 namespace {
+
+// The fields of the first page that tell a whole btree file of this machine's byte order, by their offsets.
+constexpr size_t kMagicAt = 12, kPageSizeAt = 20, kTypeAt = 25, kLastPageAt = 32, kHeader = 72;
+constexpr uint8_t kBtreeMetaType = 9;
+
+uint32_t Word(const char *page, size_t at)
+{
+    uint32_t word;
+    std::memcpy(&word, page + at, sizeof word);
+    return word;
+}
+
+bool IsWholeBtree(int fd, off_t size)
+{
+    char page[kHeader];
+    if (::pread(fd, page, sizeof page, 0) != static_cast<ssize_t>(sizeof page))
+        return false;
+    const uint32_t page_size = Word(page, kPageSizeAt);
+    return Word(page, kMagicAt) == BTREEMAGIC && static_cast<uint8_t>(page[kTypeAt]) == kBtreeMetaType &&
+           std::has_single_bit(page_size) && page_size >= 512 && page_size <= 65536 &&
+           size >= (off_t{Word(page, kLastPageAt)} + 1) * page_size;
+}
 
 // A directory of our own that goes away with what the database left in it.
 class BuildDir {
@@ -48,7 +72,7 @@ BtreeFile LookAtBtreeFile(const char *path, mode_t mode) noexcept
     const Fd fd = OpenFd(path, O_RDONLY | O_NOFOLLOW);
     if (!fd || ::fstat(fd.Get(), &st) != 0)
         return BtreeFile::unreadable;
-    if (!S_ISREG(st.st_mode) || !ReadBtreeMeta(fd.Get(), st.st_size))
+    if (!S_ISREG(st.st_mode) || !IsWholeBtree(fd.Get(), st.st_size))
         return BtreeFile::foreign;
     // Not when it has that mode already: setting it would change the time stamp by which the seal knows the file.
     if (mode != 0 && ::geteuid() == 0 && (st.st_mode & 07777) != mode)
