@@ -11,8 +11,6 @@
 
 #include "tavo_group.h"
 
-#include <nlohmann/json.hpp>
-
 #include <charconv>
 #include <set>
 
@@ -45,8 +43,7 @@ class GroupExport : public Verb {
         for (const std::string &name : GroupNames())
             if (const std::optional<Group> group = FindGroup(name); group && !IsSystemGroup(*group))
                 table.Add({group->name, group->gid, group->description, group->members});
-        WriteWhole(path_, call.json ? table.Json().dump(2, ' ', true, nlohmann::json::error_handler_t::replace) + "\n"
-                                    : table.Csv());
+        WriteWhole(path_, call.json ? table.Json() + "\n" : table.Csv());
         return exit_done;
     }
 

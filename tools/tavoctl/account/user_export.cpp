@@ -6,8 +6,6 @@
 #include "account/user_verbs.h"
 #include "frame/program.h"
 
-#include <nlohmann/json.hpp>
-
 #include <fstream>
 #include <map>
 #include <sstream>
@@ -74,8 +72,7 @@ class UserExport : public Verb {
             }
             table.Add(std::move(row));
         }
-        WriteWhole(path_, call.json ? table.Json().dump(2, ' ', true, nlohmann::json::error_handler_t::replace) + "\n"
-                                    : table.Csv());
+        WriteWhole(path_, call.json ? table.Json() + "\n" : table.Csv());
         return exit_done;
     }
 

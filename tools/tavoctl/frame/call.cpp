@@ -4,8 +4,6 @@
 #include "frame/terminal_text.h"
 #include "frame/verb.h"
 
-#include <nlohmann/json.hpp>
-
 #include <cstdio>
 #include <iostream>
 
@@ -18,7 +16,7 @@ template <class Facts>
 void PrintFacts(const Facts &facts, bool json)
 {
     if (json)
-        std::cout << facts.Json().dump(2, ' ', true, nlohmann::ordered_json::error_handler_t::replace) << "\n";
+        std::cout << facts.Json() << "\n";
     else
         std::cout << facts.Text();
 }

@@ -47,6 +47,26 @@ std::string Padded(const std::string &text, std::size_t width, bool to_the_right
     return to_the_right ? blanks + text : last ? text : text + blanks;
 }
 
+nlohmann::ordered_json ToJson(const Cell &cell)
+{
+    return std::visit(
+        [](const auto &value) -> nlohmann::ordered_json {
+            if constexpr (std::is_same_v<std::decay_t<decltype(value)>, std::monostate>)
+                return nullptr;
+            else if constexpr (std::is_same_v<std::decay_t<decltype(value)>, Bytes>)
+                return value.count;
+            else
+                return value;
+        },
+        cell.Value());
+}
+
+// Bytes that are no UTF-8 show as the replacement character.
+std::string Dump(const nlohmann::ordered_json &facts)
+{
+    return facts.dump(2, ' ', true, nlohmann::ordered_json::error_handler_t::replace);
+}
+
 }  // namespace
 
 std::string Cell::Text() const
@@ -79,22 +99,6 @@ std::string Cell::Csv() const
     for (const char c : text)
         quoted += c == '"' ? std::string("\"\"") : std::string(1, c);
     return quoted + "\"";
-}
-
-nlohmann::ordered_json Cell::Json() const
-{
-    if (std::holds_alternative<std::monostate>(value_))
-        return nullptr;
-    return std::visit(
-        [](const auto &value) -> nlohmann::ordered_json {
-            if constexpr (std::is_same_v<std::decay_t<decltype(value)>, std::monostate>)
-                return nullptr;
-            else if constexpr (std::is_same_v<std::decay_t<decltype(value)>, Bytes>)
-                return value.count;
-            else
-                return value;
-        },
-        value_);
 }
 
 std::string Table::Text() const
@@ -141,16 +145,16 @@ std::string Table::Csv() const
     return text + "\n";
 }
 
-nlohmann::ordered_json Table::Json() const
+std::string Table::Json() const
 {
     auto rows = nlohmann::ordered_json::array();
     for (const auto &row : rows_) {
         auto object = nlohmann::ordered_json::object();
         for (std::size_t i = 0; i < columns_.size(); ++i)
-            object[columns_[i]] = row[i].Json();
+            object[columns_[i]] = ToJson(row[i]);
         rows.push_back(std::move(object));
     }
-    return rows;
+    return Dump(rows);
 }
 
 // Not in the header: there the compiler for 32-bit ARM warns of parts of the fact that its kind does not have.
@@ -173,12 +177,12 @@ std::string Record::Text() const
     return text;
 }
 
-nlohmann::ordered_json Record::Json() const
+std::string Record::Json() const
 {
     auto object = nlohmann::ordered_json::object();
     for (const auto &[name, value] : fields_)
-        object[name] = value.Json();
-    return object;
+        object[name] = ToJson(value);
+    return Dump(object);
 }
 
 }  // namespace tavoctl

@@ -3,8 +3,6 @@
 #ifndef TAVOCTL_TABLE_H
 #define TAVOCTL_TABLE_H
 
-#include <nlohmann/json_fwd.hpp>
-
 #include <cstdint>
 #include <string>
 #include <utility>
@@ -33,7 +31,7 @@ class Cell {
     bool IsNumber() const { return std::holds_alternative<int64_t>(value_) || std::holds_alternative<Bytes>(value_); }
     std::string Text() const;  // printable
     std::string Csv() const;   // byte for byte; quoted where that is needed
-    nlohmann::ordered_json Json() const;
+    const auto &Value() const { return value_; }
 
   private:
     std::variant<std::monostate, std::string, int64_t, bool, Bytes, std::vector<std::string>> value_;
@@ -53,9 +51,9 @@ class Table {
     void Add(std::vector<Cell> row) { rows_.push_back(std::move(row)); }
     bool Empty() const { return rows_.empty(); }
 
-    std::string Text() const;             // numbers to the right; nothing at all without rows
-    std::string Csv() const;              // comma-separated values with a line of the columns' names
-    nlohmann::ordered_json Json() const;  // an array of objects
+    std::string Text() const;  // numbers to the right; nothing at all without rows
+    std::string Csv() const;   // comma-separated values with a line of the columns' names
+    std::string Json() const;  // an array of objects
 
   private:
     std::vector<std::string> columns_;
@@ -66,8 +64,8 @@ class Record {
   public:
     void Add(std::string name, Cell value);
 
-    std::string Text() const;             // a field a line
-    nlohmann::ordered_json Json() const;  // an object
+    std::string Text() const;  // a field a line
+    std::string Json() const;  // an object
 
   private:
     std::vector<std::pair<std::string, Cell>> fields_;
