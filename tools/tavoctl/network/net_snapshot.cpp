@@ -24,6 +24,7 @@ namespace {
 
 constexpr const char *folder = "/etc/sysconfig/network-scripts/";
 constexpr const char *network_file = "/etc/sysconfig/network";
+constexpr int most_routes = 8;
 
 std::optional<std::string> Text(const std::string &path)
 {
@@ -129,11 +130,13 @@ bool NetSnapshot::PutBackKernel() const
                0;
     if (TAVONetSetCard1(&card_, nullptr) == -1)
         return false;
-    if (const std::string now = LiveGateway(); now == gateway_)
-        return true;
-    if (gateway_.empty())
-        return TLIBSystem("/sbin/route delete default > /dev/null 2>&1") == 0;
-    return TAVONetDefaultGatewaySet(gateway_.c_str()) == 0;
+    // A route that was added beside the old one stands before it.
+    std::string now = LiveGateway();
+    for (int i = 0; i < most_routes && !now.empty() && now != gateway_; ++i) {
+        TLIBSystem(("/sbin/route delete default gw " + now + " > /dev/null 2>&1").c_str());
+        now = LiveGateway();
+    }
+    return now == gateway_ || (!gateway_.empty() && TAVONetDefaultGatewaySet(gateway_.c_str()) == 0);
 }
 
 bool NetSnapshot::PutBack() const

@@ -54,6 +54,12 @@ char Hear(int socket)
     return ::recv(socket, &word, 1, 0) == 1 ? word : '\0';
 }
 
+bool IsGone(int socket)
+{
+    char word;
+    return ::recv(socket, &word, 1, MSG_PEEK | MSG_DONTWAIT) == 0;
+}
+
 // Nothing of the terminal or the connection from which the command came; a name of its own, for whoever kills by name.
 int StandAlone()
 {
@@ -128,6 +134,11 @@ bool IsTooLate(int pid_fd, int signals)
         const std::int64_t until = Now() + 2 * longest_change * 1000ll;
         while (!(done = before.PutBack()) && Left(until) > 0)
             ::sleep(1);
+        // The last program of a killed command may have changed something after that.
+        if (IsGone(command)) {
+            ::sleep(1);
+            done = before.PutBack();
+        }
     }
     ::unlink(pid_file);
     Say(command, confirmed ? kept : done ? put_back : failed);
