@@ -8,10 +8,15 @@
 
 namespace test {
 
-// The virtual appliance, whose processor is emulated, has time for a part only.
-inline bool Emulated()
+// The virtual appliance, whose processor is emulated, has time for a part only; so has a build with sanitizers, which finds
+// in a few rounds what it is there to find.
+inline bool TakesLong()
 {
+#ifdef __SANITIZE_ADDRESS__
+    return true;
+#else
     return RootForm() == "machine";
+#endif
 }
 
 // All of them when TAVO_LONG_TESTS is in the environment; else an eighth, so that a run of everything stays short.
@@ -19,13 +24,13 @@ inline int Rounds(int all)
 {
     if (std::getenv("TAVO_LONG_TESTS"))
         return all;
-    return all / (Emulated() ? 32 : 8);
+    return all / (TakesLong() ? 32 : 8);
 }
 
 // From one of many moments to the next that is tried, such as the system calls at which something dies.
 inline int Stride()
 {
-    return Emulated() && !std::getenv("TAVO_LONG_TESTS") ? 11 : 1;
+    return TakesLong() && !std::getenv("TAVO_LONG_TESTS") ? 11 : 1;
 }
 
 }  // namespace test

@@ -228,7 +228,7 @@ class Every : public test::Services, public testing::WithParamInterface<Row> {
     void SetUp() override
     {
         if (test::Stride() > 1 && row.id % 4 != 1)
-            GTEST_SKIP() << "every fourth service: the emulated processor takes long for each";
+            GTEST_SKIP() << "every fourth service: each takes long here";
         Services::SetUp();
         if (IsSkipped())
             return;
