@@ -218,13 +218,15 @@ TEST(UserStorm, WorkersAndTheSystemsTools)
     std::map<std::string, std::string> owners;
     for (const std::string &line : test::Lines(test::FileText("/etc/passwd"))) {
         const std::string name = Field(line, 0);
-        EXPECT_TRUE(found.emplace(name, expected[name]).second) << name << " stands there twice";
+        const auto account = expected.find(name);
+        ASSERT_NE(account, expected.end()) << name << " should not be there";
+        EXPECT_TRUE(found.insert(*account).second) << name << " stands there twice";
         if (!name.starts_with('w'))
             continue;
         EXPECT_TRUE(owners.emplace(Field(line, 2), name).second) << "one user id for two: " << line;
         for (const char *path : test::kAccountFiles)
             EXPECT_NE(test::LineOf(path, name), "") << name << " in " << path;
-        CheckKept(name, expected[name]);
+        CheckKept(name, account->second);
     }
     EXPECT_EQ(found, expected);
     for (const char *path : test::kAccountFiles)
