@@ -16,8 +16,8 @@ bool SealHolds(const StoreFamily &family);
 
 void BreakSeal(const StoreFamily &family) noexcept;
 
-// What the text files look like: to be taken before they are read. Empty, which no
-// seal is written for, when one of them is no plain file.
+// What the text files look like: to be taken before they are read. Empty, for which no seal is written, when one of them is
+// no plain file or memory runs out.
 std::string StampTexts(const StoreFamily &family) noexcept;
 
 // Seals the stores as they are, to text files that looked like `texts`: somebody may have exchanged one meanwhile, and

@@ -1,24 +1,9 @@
 // Routes that are added and removed.
 #include "network/detail/route_change.h"
 
-#include "core/detail/lock_hold.h"
 #include "network/detail/net_command.h"
-#include "network/detail/network_lock.h"
-#include "tavo_error.h"
 
 namespace tavo {
-namespace {
-
-template <class Route>
-int ChangeLocked(const char *verb, const Route &route, const char *interface)
-{
-    const LockHold lock(kNetworkExclusive, kNetworkSeconds);
-    if (!lock)
-        return ERR_LOCK_FAILED;
-    return RunRouteTool(verb, route, interface) == 0 ? 0 : ERR_OP_FAILURE;
-}
-
-}  // namespace
 
 std::optional<Ipv4Route> ParseRoute(const char *network, const char *mask) noexcept
 {
@@ -51,16 +36,6 @@ int RunRouteTool(const char *verb, const Ipv6Route &route, const char *interface
         return RunNetCommand("/sbin/ip -6 route %s %s/%d via %s dev %s > /dev/null 2>&1", verb, network, route.length,
                              Ipv6Text(*route.gateway), interface);
     return RunNetCommand("/sbin/ip -6 route %s %s/%d dev %s > /dev/null 2>&1", verb, network, route.length, interface);
-}
-
-int ChangeRoute(const char *verb, const Ipv4Route &route, const char *interface)
-{
-    return ChangeLocked(verb, route, interface);
-}
-
-int ChangeRoute(const char *verb, const Ipv6Route &route, const char *interface)
-{
-    return ChangeLocked(verb, route, interface);
 }
 
 }  // namespace tavo
