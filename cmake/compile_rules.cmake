@@ -28,8 +28,15 @@ elseif(TAVO_FUZZ)
                                                 -fno-omit-frame-pointer)
     target_link_options(tavo_rules INTERFACE -fsanitize=address,undefined)
 else()
-    target_compile_options(tavo_rules INTERFACE "$<$<NOT:$<CONFIG:Debug>>:-U_FORTIFY_SOURCE;-D_FORTIFY_SOURCE=2>")
+    target_compile_options(tavo_rules INTERFACE
+        "$<$<NOT:$<OR:$<CONFIG:Debug>,$<BOOL:$<TARGET_PROPERTY:TAVO_QUICK>>>>:-U_FORTIFY_SOURCE;-D_FORTIFY_SOURCE=2>")
 endif()
+
+# For programs that run once after every build: compiled quickly, with line numbers for the debugger.
+function(tavo_compile_quickly target)
+    set_target_properties(${target} PROPERTIES TAVO_QUICK ON)
+    target_compile_options(${target} PRIVATE -O0 -g1)
+endfunction()
 
 # Compiles these headers once for the target, in builds that want it.
 function(tavo_precompile target)
@@ -39,4 +46,26 @@ function(tavo_precompile target)
         target_compile_options(${target} PRIVATE
             "$<$<COMPILE_LANG_AND_ID:CXX,GNU>:-Wno-array-bounds;-Wno-restrict;-Wno-stringop-overflow;-Wno-stringop-overread>")
     endif()
+endfunction()
+
+# Compiles the files of a target in batches. A batch never mixes folders, so a new file shuffles those of its folder only.
+function(tavo_unity_batches target)
+    if(NOT TAVO_UNITY)
+        return()
+    endif()
+    set_target_properties(${target} PROPERTIES UNITY_BUILD ON UNITY_BUILD_MODE GROUP)
+    # Of std::variant in a batch g++ 12 says so where nothing is read uninitialised.
+    target_compile_options(${target} PRIVATE "$<$<COMPILE_LANG_AND_ID:CXX,GNU>:-Wno-maybe-uninitialized>")
+    set(folder_before)
+    foreach(source IN LISTS ARGN)
+        cmake_path(GET source PARENT_PATH folder)
+        if(NOT folder STREQUAL folder_before)
+            set(folder_before ${folder})
+            set(in_folder 0)
+        endif()
+        math(EXPR batch "${in_folder} / 12")
+        math(EXPR in_folder "${in_folder} + 1")
+        string(MAKE_C_IDENTIFIER "${folder}_${batch}" group)
+        set_source_files_properties(${source} PROPERTIES UNITY_GROUP ${group})
+    endforeach()
 endfunction()

@@ -1,6 +1,7 @@
 // Switches a service: the one entry point that programs use.
 #include "tavo_service.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 #include "service/detail/service_table.h"
 

@@ -3,6 +3,7 @@
 
 #include "tavo_file.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 #include "service/detail/service_table.h"
 

@@ -1,6 +1,7 @@
 // Tells whether the service behind a data folder is enabled.
 #include "tavo_service.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 #include "service/detail/service_table.h"
 #include "service/detail/settings_files.h"

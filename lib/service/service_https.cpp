@@ -1,6 +1,7 @@
 // Switches encrypted access to the web pages. The system web server itself serves it and reads the key at its start.
 #include "tavo_service.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 
 extern "C" int TAVOServiceHTTPS(const TAVOSERVICE *pService, int action)

@@ -12,11 +12,11 @@ constexpr int kPrinter = 9;
 
 // One field of a row; the bad id is reported as the look-up's own failure.
 template <class Field>
-auto FieldOf(int id, Field TAVOSERVICE::*field, Field none, Line line = Line{__builtin_LINE()})
+auto FieldOf(int id, Field TAVOSERVICE::*field, Field none, tavo::Where where = tavo::Where())
 {
     const TAVOSERVICE *service = tavo::FindService(id);
     if (!service)
-        Fail(ERR_BAD_PARAMETERS, line);
+        Fail(ERR_BAD_PARAMETERS, where);
     return service ? service->*field : none;
 }
 

@@ -1,6 +1,7 @@
 // Points the link of a service's data folder at its target.
 #include "tavo_service.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 
 #include <cerrno>

@@ -1,6 +1,7 @@
 // Binds the services to a volume that has come back, and starts them.
 #include "tavo_service.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 #include "service/detail/data_folder.h"
 #include "service/detail/service_table.h"

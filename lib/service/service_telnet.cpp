@@ -5,6 +5,7 @@
 #include "tavo_file.h"
 #include "tavo_proc.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 
 namespace {

@@ -2,6 +2,7 @@
 #include "tavo_bdb.h"
 
 #include "account/detail/btree.h"
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 
 #include <cerrno>

@@ -3,6 +3,7 @@
 
 #include "account/detail/btree.h"
 #include "account/detail/store_bytes.h"
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 
 #include <cerrno>

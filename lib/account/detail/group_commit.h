@@ -10,28 +10,26 @@
 #include <cerrno>
 
 namespace tavo {
-namespace {
 
 // A code of DumpGroups, logged under the name of the function that wrote; stores that could not be closed are built anew
 // by the next call, so that is logged only.
-inline int CommitGroups(AccountSession &session)
+inline int CommitGroups(AccountSession &session, Where where = Where())
 {
     GroupDumpReport report;
     if (const int code = DumpGroups(GroupDb(session), report)) {
         if (report.not_opened)
-            LogError("%s:%d fail to open file[%s]", report.not_opened);
+            LogErrorAt(where, "%s:%d fail to open file[%s]", report.not_opened);
         else if (!report.lost.empty())
-            LogError("%s:%d Group [%s] would be lost, the files are left alone", report.lost);
+            LogErrorAt(where, "%s:%d Group [%s] would be lost, the files are left alone", report.lost);
         else
-            LogError("%s:%d Failed to write the group files, tavoerr=0x%04X, errno=%d", code, errno);
+            LogErrorAt(where, "%s:%d Failed to write the group files, tavoerr=0x%04X, errno=%d", code, errno);
         return code;
     }
     if (session.Seal(AccountSession::Texts::kWritten) != 0)
-        LogError("%s:%d Failed to close the group stores, errno=%d", errno);
+        LogErrorAt(where, "%s:%d Failed to close the group stores, errno=%d", errno);
     return 0;
 }
 
-}  // namespace
 }  // namespace tavo
 
 #endif

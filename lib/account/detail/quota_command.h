@@ -10,8 +10,8 @@
 namespace tavo {
 
 struct QuotaCommand {
-    const char *format;  // volume path and number
-    int failure;         // the code when the tool fails
+    CheckedFormat<ArgKind::text, ArgKind::number> format;  // volume path and number
+    int failure;                                           // the code when the tool fails
 };
 
 // 0, the command's code, or ERR_QUOTA_SHELL when it could not be run.

@@ -11,7 +11,6 @@ enum { kName, kHash, kLastChange, kMin, kMax, kWarn, kInactive, kExpire, kReserv
 
 constexpr int32_t kMaxAge = 99999;
 constexpr int32_t kMinAgeOfNever = 100000;
-constexpr time_t kDay = 86400;
 
 }  // namespace
 
@@ -30,7 +29,7 @@ int ParseShadowLine(std::string_view text, ShadowLine &line)
 
 std::string FormatShadowLine(const ShadowLine &line, time_t now)
 {
-    std::string text = line.name + ':' + line.hash + ':' + std::to_string(now / kDay) + ':';
+    std::string text = line.name + ':' + line.hash + ':' + std::to_string(now / kSecondsOfDay) + ':';
     text += std::to_string(line.cannot_change ? kMinAgeOfNever : 0) + ':' + std::to_string(kMaxAge) + ":7::";
     return text + (line.expire < 0 ? "" : std::to_string(line.expire)) + ':';
 }

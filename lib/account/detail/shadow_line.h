@@ -9,6 +9,8 @@
 
 namespace tavo {
 
+inline constexpr int64_t kSecondsOfDay = 86400;  // the file counts in days
+
 struct ShadowLine {
     std::string name;
     std::string hash;

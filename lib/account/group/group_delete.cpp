@@ -7,6 +7,7 @@
 #include "account/detail/share_groups.h"
 #include "core/detail/guard.h"
 #include "core/detail/keep_fault.h"
+#include "core/detail/log.h"
 #include "tavo_appliance.h"
 #include "tavo_lock.h"
 
@@ -23,7 +24,7 @@ void DeleteOne(const TAVOGROUPDB &db, const char *name, Keys &deleted)
         return;  // lives in its domain
     const std::optional<std::string> key = name ? tavo::AccountKey(name, tavo::kGroupKeySize) : std::nullopt;
     if (key && deleted.contains(*key))
-        return tavo::WriteLog(LOG_NOTICE, "%s:%d Duplicate group name:[%s]", {tavo::kModule, __LINE__, name});
+        return LogNotice("%s:%d Duplicate group name:[%s]", name);
     tavo::GroupLine group;
     int code = key ? tavo::ReadGroupLine(db, *key, group) : int{ERR_NO_SUCH_GROUP};
     if (code == ERR_NO_SUCH_GROUP) {

@@ -1,7 +1,7 @@
 // Lists the groups.
 #include "tavo_group.h"
 
-#include "account/detail/group_enum.h"
+#include "account/detail/group_enumeration.h"
 #include "core/detail/guard.h"
 
 extern "C" int TAVOGroupEnum(TLIBSZLIST **ppList, int flags)

@@ -1,7 +1,7 @@
 // Lists the groups whose name holds a text.
 #include "tavo_group.h"
 
-#include "account/detail/group_enum.h"
+#include "account/detail/group_enumeration.h"
 #include "core/detail/guard.h"
 
 extern "C" int TAVOGroupEnumBySubstr(TLIBSZLIST **ppList, int flags, const char *szText)

@@ -4,7 +4,7 @@
 #include "account/detail/account_name.h"
 #include "account/detail/group_line.h"
 #include "account/detail/group_owner.h"
-#include "account/detail/user_enum.h"
+#include "account/detail/user_enumeration.h"
 #include "core/detail/guard.h"
 #include "tavo_user.h"
 

@@ -7,6 +7,7 @@
 #include "account/detail/share_groups.h"
 #include "core/detail/guard.h"
 #include "core/detail/keep_fault.h"
+#include "core/detail/log.h"
 #include "tavo_appliance.h"
 #include "tavo_lock.h"
 

@@ -1,7 +1,7 @@
 // Counts the groups.
 #include "tavo_group.h"
 
-#include "account/detail/group_enum.h"
+#include "account/detail/group_enumeration.h"
 #include "core/detail/guard.h"
 
 extern "C" int TAVOGroupTotalNum(int flags)

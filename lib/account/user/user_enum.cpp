@@ -1,7 +1,7 @@
 // Lists the accounts.
 #include "tavo_user.h"
 
-#include "account/detail/user_enum.h"
+#include "account/detail/user_enumeration.h"
 #include "core/detail/guard.h"
 
 extern "C" int TAVOUserEnum(TLIBSZLIST **ppList, int flags)

@@ -2,7 +2,7 @@
 #include "tavo_user.h"
 
 #include "account/detail/account_name.h"
-#include "account/detail/user_enum.h"
+#include "account/detail/user_enumeration.h"
 #include "core/detail/guard.h"
 
 extern "C" int TAVOUserEnumByPrefix(TLIBSZLIST **ppList, int flags, const char *szText)

@@ -1,15 +1,11 @@
 // Sets the expiry day of a record from a date.
 #include "tavo_user.h"
 
+#include "account/detail/shadow_line.h"
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 
 #include <ctime>
-
-namespace {
-
-constexpr int64_t kDay = 86400;
-
-}  // namespace
 
 extern "C" int TAVOUserExpiredDateFill(TAVOUSER *pUser, const char *szDate)
 {
@@ -24,7 +20,7 @@ extern "C" int TAVOUserExpiredDateFill(TAVOUSER *pUser, const char *szDate)
         LogError("%s:%d Invalid date:%s or format:\"yyyy/mm/dd\"", szDate);
         return Fail(ERR_BAD_PARAMETERS);
     }
-    const int64_t day = seconds / kDay;
+    const int64_t day = seconds / tavo::kSecondsOfDay;
     pUser->nExpired = seconds < 0 || day > INT32_MAX ? int32_t{TAVO_USER_EXPIRE_LAST} : static_cast<int32_t>(day);
     return 0;
 }

@@ -1,6 +1,7 @@
 // Tells whether a day has passed in the appliance's time zone.
 #include "tavo_user.h"
 
+#include "account/detail/shadow_line.h"
 #include "core/detail/log.h"
 #include "core/detail/open_file.h"
 
@@ -9,7 +10,6 @@
 
 namespace {
 
-constexpr int64_t kDay = 86400;
 constexpr int64_t kSummerTime = 3600;
 constexpr size_t kLongestZone = 128;
 
@@ -40,5 +40,5 @@ extern "C" int TAVOUserIsExpired(int day)
     struct tm local = {};
     ::localtime_r(&now, &local);
     const int64_t summer = ::daylight != 0 && local.tm_isdst > 0 ? kSummerTime : 0;
-    return day * kDay + kDay + ::timezone - summer <= now ? 1 : 0;
+    return day * tavo::kSecondsOfDay + tavo::kSecondsOfDay + ::timezone - summer <= now ? 1 : 0;
 }

@@ -30,8 +30,7 @@ void ReportEntry(const tavo::UserBatch::Outcome &outcome, const char *old_name, 
         LogError("%s:%d Duplicated key:[%s]", old_name);
     if (outcome.absent)
         LogError("%s:%d szOldName=[%s] is NOT EXIST.", old_name);
-    tavo::WriteLog(LOG_NOTICE, "%s:%d Failed to set user [%s], tavoerr=0x%04X",
-                   {tavo::kModule, __LINE__, name, outcome.code});
+    LogNotice("%s:%d Failed to set user [%s], tavoerr=0x%04X", name, outcome.code);
     Fail(outcome.code);
 }
 

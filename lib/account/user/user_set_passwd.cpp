@@ -97,8 +97,7 @@ extern "C" int TAVOUserSetPasswd(const TAVOUSER *const *rgpUser, const char *con
             const Outcome outcome = SetHashes(db, rgpUser[i]->szName, {rgszHash[i], rgszLmHash[i], rgszNtHash[i]});
             if (outcome.code != 0) {
                 Fail(outcome.code);
-                tavo::WriteLog(LOG_NOTICE, "%s:%d Failed to set the password of [%s], tavoerr=0x%04X",
-                               {tavo::kModule, __LINE__, rgpUser[i]->szName, outcome.code});
+                LogNotice("%s:%d Failed to set the password of [%s], tavoerr=0x%04X", rgpUser[i]->szName, outcome.code);
             }
             if (outcome.damaged)
                 return -1;

@@ -1,7 +1,7 @@
 // Counts the accounts.
 #include "tavo_user.h"
 
-#include "account/detail/user_enum.h"
+#include "account/detail/user_enumeration.h"
 #include "core/detail/guard.h"
 
 extern "C" int TAVOUserTotalNum(int flags)

@@ -1,10 +1,8 @@
-// How an exported function reports a failure: code, module and line in one call that hands back the failure value.
-//
-// TAVO_MODULE is the base name of the file that is compiled; the build passes it, so a log line or an error state
-// leads straight to the file.
+// How an exported function reports a failure: code, module and line in one call that returns the failure value.
 #ifndef TAVO_CORE_DETAIL_FAULT_H
 #define TAVO_CORE_DETAIL_FAULT_H
 
+#include "core/detail/where.h"
 #include "tavo_error.h"
 
 namespace tavo {
@@ -17,45 +15,20 @@ struct FaultSource {
 
 extern FaultSource fault_source;
 
-// A line number in a report. Written out (`Line{52}`) it is a published one: log watchers and support staff know it,
-// so it stays when the code moves.
-struct Line {
-    int number;
-};
-
-namespace {
-
-[[maybe_unused]] constexpr const char *kModule = TAVO_MODULE;
-
 // Records the failure; for integer results.
-[[maybe_unused]] inline int Fail(int code, Line line = Line{__builtin_LINE()}) noexcept
-{
-    TLIBErrSetEx(code, kModule, line.number);
-    return -1;
-}
+int Fail(int code, Where where = Where()) noexcept;
 
 // The same for pointer results.
-[[maybe_unused]] inline decltype(nullptr) FailNull(int code, Line line = Line{__builtin_LINE()}) noexcept
-{
-    TLIBErrSetEx(code, kModule, line.number);
-    return nullptr;
-}
+decltype(nullptr) FailNull(int code, Where where = Where()) noexcept;
 
 // The same for results whose failure value is 0 or false.
-[[maybe_unused]] inline bool FailZero(int code, Line line = Line{__builtin_LINE()}) noexcept
-{
-    TLIBErrSetEx(code, kModule, line.number);
-    return false;
-}
-
-}  // namespace
+bool FailZero(int code, Where where = Where()) noexcept;
 
 }  // namespace tavo
 
-// Exported functions stand outside the namespace and report in every other line.
+// Exported functions are outside the namespace and report in every other line.
 using tavo::Fail;
 using tavo::FailNull;
 using tavo::FailZero;
-using tavo::Line;
 
 #endif

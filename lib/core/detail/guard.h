@@ -1,42 +1,66 @@
-// Keeps exceptions inside: the boundary is C, and running out of memory is an answer there, not a crash.
+// Keeps exceptions inside: the boundary is C, where running out of memory is an answer and not a crash.
 #ifndef TAVO_CORE_DETAIL_GUARD_H
 #define TAVO_CORE_DETAIL_GUARD_H
 
 #include "core/detail/fault.h"
 
-#include <new>
-#include <stdexcept>
 #include <type_traits>
 
 namespace tavo {
-namespace {
 
-// Runs the body of an exported function. When memory runs out, records `code` and gives the failure value of the
-// body's result type: -1 for integers, false for booleans, NULL for pointers.
+// While one of these lives, the cancellation of this thread waits: it unwinds the stack by an exception that must not be
+// caught, and would end the whole program at the boundary.
+class CancellationOff {
+  public:
+    CancellationOff() noexcept;
+    ~CancellationOff();
+    CancellationOff(const CancellationOff &) = delete;
+    CancellationOff &operator=(const CancellationOff &) = delete;
+
+  private:
+    int before_;
+};
+
+// Called in a handler: the code that the exception in flight becomes. That is `out_of_memory` for an allocation that
+// failed or a text larger than the address space; everything else is ERR_UNKNOWN and logged.
+int CodeOfException(int out_of_memory, const Where &where) noexcept;
+
+// Runs the body of an exported function. An exception is recorded as its code, and the failure value of the body's
+// result type is returned: -1 for integers, false for booleans, NULL for pointers.
 template <class Body>
-auto Guard(Body &&body, int code = ERR_OUT_OF_MEMORY, Line line = Line{__builtin_LINE()}) noexcept -> decltype(body())
+auto Guard(Body &&body, int out_of_memory = ERR_OUT_OF_MEMORY, Where where = Where()) noexcept -> decltype(body())
 {
     using Result = decltype(body());
-    const auto out_of_memory = [&]() -> Result {
-        if constexpr (std::is_void_v<Result>)
-            FailZero(code, line);
-        else if constexpr (std::is_pointer_v<Result>)
-            return FailNull(code, line);
-        else if constexpr (std::is_same_v<Result, bool>)
-            return FailZero(code, line);
-        else
-            return static_cast<Result>(Fail(code, line));
-    };
+    const CancellationOff cancellation_off;
     try {
         return body();
-    } catch (const std::bad_alloc &) {
-        return out_of_memory();
-    } catch (const std::length_error &) {  // a text that would be larger than the address space
-        return out_of_memory();
+    } catch (...) {
+        const int code = CodeOfException(out_of_memory, where);
+        if constexpr (std::is_void_v<Result>)
+            Fail(code, where);
+        else if constexpr (std::is_pointer_v<Result>)
+            return FailNull(code, where);
+        else if constexpr (std::is_same_v<Result, bool>)
+            return FailZero(code, where);
+        else
+            return static_cast<Result>(Fail(code, where));
     }
 }
 
-}  // namespace
+// The same for a function that records nothing: returns `failure` after an exception.
+template <class Body>
+auto GuardSilently(Body &&body, std::type_identity_t<decltype(body())> failure, Where where = Where()) noexcept
+    -> decltype(body())
+{
+    const CancellationOff cancellation_off;
+    try {
+        return body();
+    } catch (...) {
+        CodeOfException(ERR_OUT_OF_MEMORY, where);
+        return failure;
+    }
+}
+
 }  // namespace tavo
 
 using tavo::Guard;

@@ -7,6 +7,7 @@
 #ifndef TAVO_CORE_DETAIL_SHELL_COMMAND_H
 #define TAVO_CORE_DETAIL_SHELL_COMMAND_H
 
+#include "core/detail/checked_format.h"
 #include "core/detail/text_format.h"
 
 #include <initializer_list>
@@ -40,9 +41,9 @@ TextArg AsTextArg(const Value &value)
 // Formats as FormatText does; "%s" may stand within single quotes. Empty when a text argument starts with "-", where a
 // program would take it for an option, or holds a NUL byte. Throws bad_alloc.
 template <class... Args>
-std::optional<std::string> ShellCommand(const char *format, const Args &...args)
+std::optional<std::string> ShellCommand(FormatFor<Args...> format, const Args &...args)
 {
-    return ComposeShellCommand(format, {AsTextArg(args)...}, {std::is_same_v<Args, ComposedPiece>...});
+    return ComposeShellCommand(format.Text(), {AsTextArg(args)...}, {std::is_same_v<Args, ComposedPiece>...});
 }
 
 // The text as one word of the shell: itself when all its characters are plain, else quoted.

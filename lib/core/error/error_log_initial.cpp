@@ -8,11 +8,10 @@ extern "C" void TLIBErrLogInitial(const char *szPath)
 {
     if (!szPath)
         return;
-    try {
-        const tavo::Fd fd = tavo::OpenLogFile(szPath, O_WRONLY | O_CREAT | O_TRUNC);
-        if (fd)
-            tavo::SyncFd(fd.Get());
-    } catch (const std::bad_alloc &) {
-        return;  // silent, as for a file that cannot be opened
-    }
+    tavo::GuardSilently(
+        [&] {
+            const tavo::Fd fd = tavo::OpenLogFile(szPath, O_WRONLY | O_CREAT | O_TRUNC);
+            return fd && tavo::SyncFd(fd.Get());
+        },
+        false);
 }

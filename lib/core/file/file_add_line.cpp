@@ -2,6 +2,7 @@
 #include "tavo_file.h"
 
 #include "core/detail/rewrite_report.h"
+#include "core/detail/settings_text.h"
 
 namespace {
 

@@ -2,6 +2,7 @@
 #include "tavo_file.h"
 
 #include "core/detail/file_append.h"
+#include "core/detail/guard.h"
 #include "core/detail/key_value_line.h"
 #include "core/detail/line_format.h"
 #include "core/detail/line_reader.h"

@@ -1,6 +1,7 @@
 // Turns the lines of a key into comments.
 #include "tavo_file.h"
 
+#include "core/detail/guard.h"
 #include "core/detail/key_value_line.h"
 #include "core/detail/line_reader.h"
 #include "core/detail/rewrite_report.h"

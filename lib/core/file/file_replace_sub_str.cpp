@@ -1,6 +1,7 @@
 // Replaces a text in every line.
 #include "tavo_file.h"
 
+#include "core/detail/guard.h"
 #include "core/detail/rewrite_report.h"
 
 #include <climits>

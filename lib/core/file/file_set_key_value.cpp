@@ -1,6 +1,7 @@
 // Sets one key by a safe rewrite.
 #include "tavo_file.h"
 
+#include "core/detail/guard.h"
 #include "core/detail/key_value_line.h"
 #include "core/detail/line_format.h"
 #include "core/detail/rewrite_report.h"

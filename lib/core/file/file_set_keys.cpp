@@ -1,10 +1,12 @@
 // Sets many keys in one safe rewrite.
 #include "tavo_file.h"
 
+#include "core/detail/guard.h"
 #include "core/detail/key_value_line.h"
 #include "core/detail/line_format.h"
 #include "core/detail/line_reader.h"
 #include "core/detail/list_owner.h"
+#include "core/detail/log.h"
 #include "core/detail/rewrite_report.h"
 #include "core/detail/settings_text.h"
 

@@ -2,6 +2,7 @@
 #include "tavo_file.h"
 
 #include "core/detail/rewrite_report.h"
+#include "core/detail/settings_text.h"
 
 extern "C" int TLIBFileSetLine(const char *szPath, int lineNo, const char *szLine)
 {

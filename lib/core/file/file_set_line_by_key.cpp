@@ -2,6 +2,7 @@
 #include "tavo_file.h"
 
 #include "core/detail/rewrite_report.h"
+#include "core/detail/settings_text.h"
 
 extern "C" int TLIBFileSetLineByKey(const char *szPath, const char *szKey, const char *szLine)
 {

@@ -1,6 +1,7 @@
 // Removes a leading UTF-8 byte-order mark.
 #include "tavo_file.h"
 
+#include "core/detail/guard.h"
 #include "core/detail/rewrite_report.h"
 
 extern "C" int TLIBFileUTF8BomStrip(const char *szPath)

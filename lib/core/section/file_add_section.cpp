@@ -2,6 +2,7 @@
 #include "tavo_section.h"
 
 #include "core/detail/file_append.h"
+#include "core/detail/guard.h"
 #include "core/detail/rewrite_report.h"
 #include "core/detail/section_text.h"
 

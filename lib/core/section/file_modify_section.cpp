@@ -1,6 +1,7 @@
 // Replaces or removes a section by a safe rewrite.
 #include "tavo_section.h"
 
+#include "core/detail/guard.h"
 #include "core/detail/line_reader.h"
 #include "core/detail/rewrite_report.h"
 #include "core/detail/section_header.h"

@@ -6,6 +6,9 @@
 
 namespace tavo {
 
+// Of the sixteen bytes of a NetBIOS name the last is its type.
+inline constexpr size_t kLongestNetbiosName = 15;
+
 constexpr bool IsLetter(char byte) noexcept
 {
     return (byte >= 'a' && byte <= 'z') || (byte >= 'A' && byte <= 'Z');

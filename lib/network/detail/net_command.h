@@ -9,7 +9,7 @@ namespace tavo {
 
 // The exit status; -1 when the command could not be composed or run, or was killed.
 template <class... Args>
-int RunNetCommand(const char *format, const Args &...args)
+int RunNetCommand(FormatFor<Args...> format, const Args &...args)
 {
     const auto command = ShellCommand(format, args...);
     return command ? RunCommand(*command) : -1;

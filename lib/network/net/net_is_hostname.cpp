@@ -4,18 +4,12 @@
 #include "core/detail/fault.h"
 #include "network/detail/name_text.h"
 
-namespace {
-
-constexpr size_t kLongest = 15;  // what NetBIOS leaves for a name
-
-}  // namespace
-
 extern "C" int BlTLIBIsHostname(const char *szName)
 {
     if (!szName)
         return FailZero(ERR_BAD_PARAMETERS);
     const std::string_view name = szName;
-    if (name.empty() || name.size() > kLongest || !(tavo::IsLetter(name[0]) || name[0] == '_'))
+    if (name.empty() || name.size() > tavo::kLongestNetbiosName || !(tavo::IsLetter(name[0]) || name[0] == '_'))
         return FailZero(ERR_INVALID_NETNAME);
     for (const char byte : name) {
         if (!tavo::IsLetter(byte) && !tavo::IsDigit(byte) && byte != '-' && byte != '_')

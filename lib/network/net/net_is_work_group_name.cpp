@@ -6,8 +6,6 @@
 
 namespace {
 
-constexpr size_t kLongest = 15;  // the sixteenth byte of a NetBIOS name is its type
-
 bool IsAllowed(char byte)
 {
     constexpr std::string_view marks = " !@#$%^&()-_'{}.~";
@@ -21,7 +19,7 @@ extern "C" int BlTLIBIsWorkGroupName(const char *szName)
     if (!szName)
         return FailZero(ERR_BAD_PARAMETERS);
     const std::string_view name = szName;
-    if (name.empty() || name.size() > kLongest)
+    if (name.empty() || name.size() > tavo::kLongestNetbiosName)
         return FailZero(ERR_INVALID_NETNAME);
     // Blanks may stand inside only: at the end they are the padding of the name on the wire.
     if (name.front() == '.' || name.front() == ' ' || name.back() == ' ')

@@ -3,7 +3,6 @@
 
 #include "core/detail/guard.h"
 #include "network/detail/interface_name.h"
-#include "network/detail/network_change.h"
 #include "network/detail/route_change.h"
 
 extern "C" int TAVONetRouteAdd(const char *szNet, const char *szMask, const char *szInterface)
@@ -14,7 +13,7 @@ extern "C" int TAVONetRouteAdd(const char *szNet, const char *szMask, const char
     if (!route)
         return Fail(ERR_INVALID_NETNAME);
     return Guard([&] {
-        return tavo::ChangeNetwork(
-            [&] { return tavo::RunRouteTool("add", *route, szInterface) == 0 ? 0 : Fail(ERR_OP_FAILURE); });
+        const int code = tavo::ChangeRoute("add", *route, szInterface);
+        return code == 0 ? 0 : Fail(code);
     });
 }

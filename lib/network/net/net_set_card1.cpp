@@ -2,6 +2,7 @@
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"
+#include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
 #include "core/detail/pid_file.h"
 #include "network/detail/connected_route.h"
@@ -10,7 +11,7 @@
 #include "network/detail/interface_name.h"
 #include "network/detail/ipv4_text.h"
 #include "network/detail/net_command.h"
-#include "network/detail/network_change.h"
+#include "network/detail/network_lock.h"
 
 #include <cerrno>
 #include <csignal>
@@ -20,6 +21,7 @@
 
 namespace {
 
+constexpr int kDhcpSeconds = 30;
 constexpr int kKillRounds = 30;  // a client that outlives so many kills hangs in the kernel
 
 int Configure(const char *interface, const tavo::Ipv4 &address, const tavo::Ipv4 &mask)
@@ -29,37 +31,19 @@ int Configure(const char *interface, const tavo::Ipv4 &address, const tavo::Ipv4
                                address.Text(), mask.Text(), broadcast.Text());
 }
 
-// What the interface has before it is changed.
-struct Before {
-    explicit Before(const char *interface)
-        : routes(tavo::LiveRoutes()), dhcp(tavo::ReadSetting(tavo::InterfaceFile(interface), "BOOTPROTO") == "dhcp"),
-          client(tavo::HasDhcpClient(interface))
-    {
-    }
-
-    std::vector<tavo::Route> routes;
-    bool dhcp;
-    bool client;
-    bool cleared = false;  // the old address has been taken away, and with it every route
-};
-
-// Restores the previous address, from the interface file, which is still unchanged, or from the DHCP lease, and the
-// routes and the client that went with it.
-void Recover(const char *interface, const Before &before)
+// The settings that the interface had before: its file has not been touched by then, or its client noted the lease.
+void Recover(const char *interface)
 {
-    const std::string file = before.dhcp ? tavo::DhcpLeaseFile(interface) : tavo::InterfaceFile(interface);
+    const std::string own = tavo::InterfaceFile(interface);
+    const std::string file = tavo::ReadSetting(own, "BOOTPROTO") == "dhcp" ? tavo::DhcpLeaseFile(interface) : own;
     const auto address = tavo::ParseIpv4(tavo::ReadSetting(file, "IPADDR"));
     const auto mask = tavo::ParseIpv4(tavo::ReadSetting(file, "NETMASK"));
     if (address && mask && Configure(interface, *address, *mask) != 0)
         LogError("%s(%d): TAVOIRecoverIPSetting failed.(%X)", ERR_OP_FAILURE);
-    tavo::PutBackRoutes(before.routes, before.cleared ? std::vector<tavo::Route>() : tavo::LiveRoutes(), interface);
-    tavo::RepairRoutes(interface, before.dhcp);
-    if (before.client && !tavo::HasDhcpClient(interface))
-        tavo::StartDhcpClient(interface);
 }
 
 // Ends the client that runs, so that two never fight over one interface.
-bool EndClient(const char *interface, Before &before)
+bool EndClient(const char *interface)
 {
     for (int round = 0; tavo::KillDhcpClient(interface) == tavo::ClientEnd::alive; ++round) {
         if (round == kKillRounds)
@@ -68,7 +52,6 @@ bool EndClient(const char *interface, Before &before)
         LogError("%s(%d) dhcpcd pid[%d] still exists, wait 1 second.", pid.value_or(0));
         ::sleep(1);
     }
-    before.cleared = true;
     if (tavo::RunNetCommand("/sbin/ifconfig %s 0.0.0.0 > /dev/null 2>&1", interface) != 0)
         LogError("%s:%d Initial setting interface [%s] error %s", interface, std::strerror(errno));
     ::sleep(1);
@@ -76,15 +59,15 @@ bool EndClient(const char *interface, Before &before)
     return true;
 }
 
-int UseDhcp(const char *interface, Before &before)
+int UseDhcp(const char *interface)
 {
-    if (!EndClient(interface, before)) {
-        Recover(interface, before);
+    if (!EndClient(interface)) {
+        Recover(interface);
         return Fail(ERR_OP_FAILURE);
     }
-    if (tavo::RunNetCommand("/sbin/dhcpcd -n %s -t %d > /dev/null 2>&1", interface, tavo::kDhcpSeconds) != 0) {
+    if (tavo::RunNetCommand("/sbin/dhcpcd -n %s -t %d > /dev/null 2>&1", interface, kDhcpSeconds) != 0) {
         LogError("%s(%d) run dhcpcd error %s", std::strerror(errno));
-        Recover(interface, before);
+        Recover(interface);
         return Fail(ERR_OP_FAILURE);
     }
     const tavo::SettingChange changes[] = {
@@ -118,19 +101,17 @@ void TellDynamicDns()
              told == tavo::PidSignal::failed ? "failed" : "");
 }
 
-int UseStatic(const TAVONETCARD &card, const TAVONETCARD *previous, Before &before)
+int UseStatic(const TAVONETCARD &card, const TAVONETCARD *previous)
 {
     const char *const interface = card.szInterface;
     const tavo::Ipv4 address = *tavo::ParseIpv4(card.szIp);
     const tavo::Ipv4 mask = *tavo::ParseIpv4(card.szMask);
 
     // A client that still renews its lease would take the address away again.
-    if (tavo::ReadPidFile(tavo::DhcpPidFile(interface).c_str()).value_or(0) > 0 && !EndClient(interface, before)) {
-        Recover(interface, before);
+    if (tavo::ReadPidFile(tavo::DhcpPidFile(interface).c_str()).value_or(0) > 0 && !EndClient(interface))
         return Fail(ERR_OP_FAILURE);
-    }
     if (Configure(interface, address, mask) != 0) {
-        Recover(interface, before);
+        Recover(interface);
         return Fail(ERR_OP_FAILURE);
     }
     const tavo::SettingChange changes[] = {
@@ -171,13 +152,12 @@ extern "C" int TAVONetSetCard1(const TAVONETCARD *pCard, const TAVONETCARD *pPre
             return Fail(ERR_INVALID_NETNAME);
     }
     return Guard([&] {
-        return tavo::ChangeNetwork([&] {
-            const bool dhcp = card.nMode == TAVO_NET_DHCP;
-            Before before(card.szInterface);
-            const int result = dhcp ? UseDhcp(card.szInterface, before) : UseStatic(card, pPrevious, before);
-            if (result != -1)
-                tavo::RepairRoutes(card.szInterface, dhcp);
-            return result;
-        });
+        const tavo::LockHold lock(tavo::kNetworkExclusive, tavo::kNetworkSeconds);
+        if (!lock)
+            return Fail(ERR_LOCK_FAILED);
+        const int result = card.nMode == TAVO_NET_DHCP ? UseDhcp(card.szInterface) : UseStatic(card, pPrevious);
+        if (result == 0)
+            tavo::RepairRoutes();
+        return result;
     });
 }

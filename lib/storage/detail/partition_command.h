@@ -15,11 +15,11 @@ struct CommandResult {
 };
 
 template <class... Args>
-CommandResult RunDiskCommand(const char *format, const Args &...args)
+CommandResult RunDiskCommand(FormatFor<Args...> format, const Args &...args)
 {
     const std::optional<std::string> command = ShellCommand(format, args...);
     if (!command)
-        return {format, -1};
+        return {format.Text(), -1};
     const int status = RunCommand(*command);
     return {*command, status};
 }

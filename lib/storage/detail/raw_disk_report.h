@@ -6,22 +6,20 @@
 #include "storage/detail/raw_disk.h"
 
 namespace tavo {
-namespace {
 
 // What the body gives for the open disk; -1 with a code of OpenRawDisk.
 template <class Body>
-int WithRawDisk(const char *path, Body &&body, Line line = Line{__builtin_LINE()})
+int WithRawDisk(const char *path, Body &&body, Where where = Where())
 {
     const auto open_first = [&]() -> int {
         RawDisk disk;
         if (const int code = disk.Open(path))
-            return Fail(code, line);
+            return Fail(code, where);
         return body(disk);
     };
-    return Guard(open_first, ERR_OUT_OF_MEMORY, line);
+    return Guard(open_first, ERR_OUT_OF_MEMORY, where);
 }
 
-}  // namespace
 }  // namespace tavo
 
 #endif

@@ -1,6 +1,7 @@
 // Asks for the power state of a drive, without waking it.
 #include "tavo_disk.h"
 
+#include "core/detail/fault.h"
 #include "storage/detail/raw_disk_report.h"
 
 extern "C" int TAVOIDiskCheckPower(const char *szPath, unsigned char *pState)

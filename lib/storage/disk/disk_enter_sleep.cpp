@@ -1,6 +1,7 @@
 // Puts a drive to sleep.
 #include "tavo_disk.h"
 
+#include "core/detail/fault.h"
 #include "storage/detail/raw_disk_report.h"
 
 #include <cstdint>

@@ -1,6 +1,7 @@
 // Writes everything that the kernel and the drive hold for a disk.
 #include "tavo_disk.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 #include "storage/detail/raw_disk_report.h"
 

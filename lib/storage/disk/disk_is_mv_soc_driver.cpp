@@ -16,7 +16,7 @@ extern "C" int TAVODiskIsMvSocDriver(const char *szPath)
         std::string unreadable;
         const int result = tavo::HangsOnMarvell(szPath, unreadable);
         if (result < 0)
-            tavo::WriteLog(LOG_ERR, "readlink() from %s failed. (%s)", {unreadable, std::strerror(errno)});
+            tavo::LogBare("readlink() from %s failed. (%s)", unreadable, std::strerror(errno));
         return result;
     });
 }

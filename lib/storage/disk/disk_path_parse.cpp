@@ -1,6 +1,7 @@
 // Takes the path of a disk apart.
 #include "tavo_disk.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 #include "storage/detail/disk_path.h"
 

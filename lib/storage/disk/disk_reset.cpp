@@ -1,6 +1,7 @@
 // Resets a drive.
 #include "tavo_disk.h"
 
+#include "core/detail/fault.h"
 #include "storage/detail/raw_disk_report.h"
 
 #include <linux/hdreg.h>

@@ -1,6 +1,7 @@
 // Spins one disk down.
 #include "tavo_disk.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 #include "storage/detail/raw_disk_report.h"
 

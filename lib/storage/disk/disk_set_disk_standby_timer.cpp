@@ -1,6 +1,7 @@
 // Sets the spin-down timer of one drive.
 #include "tavo_disk.h"
 
+#include "core/detail/fault.h"
 #include "storage/detail/raw_disk_report.h"
 
 extern "C" int TAVOIDiskSetDiskStandbyTimer(const char *szPath, int nValue)

@@ -1,6 +1,7 @@
 // Gives the size of a disk or partition in sectors.
 #include "tavo_disk.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 #include "storage/detail/disk_size.h"
 

@@ -20,7 +20,7 @@ extern "C" int TAVODiskWriteCacheGet(const char *szPath)
         }
         tavo::DrivePage identity = {};
         if (!disk.Identify(identity)) {
-            tavo::WriteLog(LOG_ERR, "%s HDIO_DRIVE_CMD(identify) failed", {szPath});
+            tavo::LogBare("%s HDIO_DRIVE_CMD(identify) failed", szPath);
             return 0;
         }
         return tavo::HasWriteCacheOn(identity) ? 1 : 0;

@@ -1,6 +1,7 @@
 // Switches the write cache of a drive.
 #include "tavo_disk.h"
 
+#include "core/detail/fault.h"
 #include "storage/detail/caching_page.h"
 #include "storage/detail/raw_disk_report.h"
 

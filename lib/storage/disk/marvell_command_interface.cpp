@@ -11,7 +11,7 @@ constexpr unsigned char kSmartMid = 0x4F;  // without these two a drive takes no
 constexpr unsigned char kSmartHigh = 0xC2;
 
 // clang-format off
-constexpr tavo::AtaCommand kRows[] = {
+constexpr tavo::AtaCommand kTaskCommands[] = {
     {0xB0, 0xD8, 0, 1, kSmartMid, kSmartHigh},  // SMART ENABLE OPERATIONS
     {0xB0, 0xD0, 1, 0, kSmartMid, kSmartHigh},  // SMART READ DATA
     {0xB0, 0xD1, 1, 1, kSmartMid, kSmartHigh},  // SMART READ THRESHOLDS
@@ -24,7 +24,7 @@ constexpr tavo::AtaCommand kRows[] = {
     {0xE7},                                     // FLUSH CACHE
 };
 // clang-format on
-static_assert(std::size(kRows) == DISK_COMMAND_FLUSH + 1);
+static_assert(std::size(kTaskCommands) == DISK_COMMAND_FLUSH + 1);
 
 constexpr bool ReturnsPage(int command)
 {
@@ -43,7 +43,7 @@ extern "C" int marvell_command_interface(int fd, int nCommand, unsigned char *pD
     const bool one_byte = nCommand == DISK_COMMAND_CHECK_POWER || nCommand == DISK_COMMAND_SET_TIMER;
     if (!pData && (page || one_byte))
         return -1;
-    tavo::AtaCommand command = kRows[nCommand];
+    tavo::AtaCommand command = kTaskCommands[nCommand];
     if (nCommand == DISK_COMMAND_SET_TIMER)
         command.count = pData[0];
     tavo::AtaResult result = {};

@@ -17,7 +17,7 @@ constexpr size_t kArguments = 4;
 
 // The request's four bytes. For SMART the first number is the sector number and the second the sector count; for all
 // others the first is the sector count, and the second how many sectors of data come back.
-struct Row {
+struct DriveCommand {
     unsigned char command;
     unsigned char first;
     unsigned char feature;
@@ -26,7 +26,7 @@ struct Row {
 };
 
 // clang-format off
-constexpr Row kRows[] = {
+constexpr DriveCommand kDriveCommands[] = {
     {0xB0, 1, 0xD8, 0, 0},                 // SMART ENABLE OPERATIONS
     {0xB0, 0, 0xD0, 1, tavo::kPageBytes},  // SMART READ DATA
     {0xB0, 1, 0xD1, 1, tavo::kPageBytes},  // SMART READ THRESHOLDS
@@ -38,7 +38,7 @@ constexpr Row kRows[] = {
     {0xA1, 1, 0x00, 1, tavo::kPageBytes},  // IDENTIFY PACKET DEVICE
 };
 // clang-format on
-static_assert(std::size(kRows) == DISK_COMMAND_FLUSH);
+static_assert(std::size(kDriveCommands) == DISK_COMMAND_FLUSH);
 
 // A packet device answers the one of the two that other devices refuse.
 int SwapForPacketDevice(int fd, int command)
@@ -66,7 +66,7 @@ extern "C" int ata_command_interface(int fd, int nCommand, unsigned char *pData)
         return -1;
     if (nCommand == DISK_COMMAND_IDENTIFY || nCommand == DISK_COMMAND_IDENTIFY_PACKET)
         nCommand = SwapForPacketDevice(fd, nCommand);
-    const Row &row = kRows[nCommand];
+    const DriveCommand &row = kDriveCommands[nCommand];
     const bool returns_register = nCommand == DISK_COMMAND_CHECK_POWER;
     if (!pData && (row.returned || returns_register))
         return -1;

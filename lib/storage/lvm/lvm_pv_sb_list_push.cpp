@@ -1,6 +1,7 @@
 // Appends a physical volume to a list.
 #include "tavo_lvm.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 
 #include <cerrno>

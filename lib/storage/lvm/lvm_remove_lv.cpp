@@ -13,7 +13,7 @@
 namespace {
 
 template <class Arg>
-void Try(const char *format, const Arg &arg)
+void Try(tavo::FormatFor<Arg> format, const Arg &arg)
 {
     const tavo::CommandResult result = tavo::RunDiskCommand(format, arg);
     if (result.status != 0)

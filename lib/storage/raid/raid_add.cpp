@@ -13,7 +13,7 @@ extern "C" int RAIDAdd(const RAIDINFO *pInfo, const char *szMember)
         return Fail(ERR_BAD_PARAMETERS);
     }
     return Guard([&] {
-        const char *format = "/sbin/mdadm %s -a %s > /dev/null 2>&1";
+        tavo::CheckedFormat<tavo::ArgKind::text, tavo::ArgKind::text> format = "/sbin/mdadm %s -a %s > /dev/null 2>&1";
         switch (pInfo->fLevel) {
         case RAID_LEVEL_1:
         case RAID_LEVEL_5:

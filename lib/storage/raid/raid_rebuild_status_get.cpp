@@ -1,6 +1,7 @@
 // Asks the appliance's driver how far a rebuild has come.
 #include "tavo_raid.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 #include "storage/detail/array_members.h"
 

@@ -1,6 +1,7 @@
 // Waits for the rebuilds of several arrays.
 #include "tavo_raid.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 
 extern "C" int RAIDRebuildingMultiWait(const TLIBSZLIST *pslPaths)

@@ -1,6 +1,7 @@
 // Waits until an array is no longer being rebuilt.
 #include "tavo_raid.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 #include "storage/detail/array_name.h"
 

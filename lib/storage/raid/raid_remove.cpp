@@ -1,6 +1,7 @@
 // Removes an array.
 #include "tavo_raid.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 #include "storage/detail/array_name.h"
 

@@ -1,6 +1,7 @@
 // Removes several arrays.
 #include "tavo_raid.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 
 #include <memory>

@@ -1,6 +1,7 @@
 // Decides the health of an array.
 #include "tavo_raid.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/log.h"
 #include "storage/detail/array_level.h"
 

@@ -30,8 +30,8 @@ TEST(ShellCommand, HostileArgumentsComeOutOfTheShellUnchanged)
     for (const std::string text :
          {"",  " ",     "a b", "$(reboot)", "`id`",  "a;b|c&d", "it's", "''",       "'",   "\"x\"", "\\",  "a\\'b",
           "*", "~root", "#x",  "!",         "$PATH", "{a,b}",   "a\tb", "\xC3\xA9", "x>y", "x-",    "%s%n"}) {
-        for (const char *format : {"printf '<%%s>' %s after", "printf '<%%s>' '%s' after"}) {
-            const auto command = ShellCommand(format, text);
+        for (const auto &command :
+             {ShellCommand("printf '<%%s>' %s after", text), ShellCommand("printf '<%%s>' '%s' after", text)}) {
             ASSERT_TRUE(command);
             tavo::CommandOutput output(*command);
             std::string line;

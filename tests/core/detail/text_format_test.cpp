@@ -39,12 +39,13 @@ TEST(WriteLog, KeepsArgumentsInTheirLine)
 
 TEST(LogError, SaysModuleAndLine)
 {
+    // This file is not one of the library's.
     test::CapturedLog log;
     LogError({"%s:%d Parameter error", 37});
     LogDebug("%s:%d here");
     ASSERT_EQ(log.Lines().size(), 2u);
-    EXPECT_EQ(log.Lines()[0], (test::LoggedLine{LOG_ERR, "test:37 Parameter error"}));
-    EXPECT_EQ(log.Lines()[1], (test::LoggedLine{LOG_DEBUG, "test:" + std::to_string(__LINE__ - 3) + " here"}));
+    EXPECT_EQ(log.Lines()[0], (test::LoggedLine{LOG_ERR, "unknown:37 Parameter error"}));
+    EXPECT_EQ(log.Lines()[1], (test::LoggedLine{LOG_DEBUG, "unknown:" + std::to_string(__LINE__ - 3) + " here"}));
 }
 
 }  // namespace

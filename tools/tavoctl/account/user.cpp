@@ -14,8 +14,6 @@
 namespace tavoctl {
 namespace {
 
-constexpr char name_help[] = "the account, in any case";
-
 std::vector<std::string> GroupsOf(const std::string &user)
 {
     StringList names;
@@ -82,7 +80,7 @@ class UserShow : public Verb {
 
     void Declare(Arguments &arguments) override
     {
-        arguments.OptionalText("NAME", name_, name_help, UserNames);
+        arguments.OptionalText("NAME", name_, user_help, UserNames);
         arguments.Number("--uid", "N", uid_, "the account with this id, in place of a name");
     }
 

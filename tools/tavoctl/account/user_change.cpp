@@ -11,8 +11,6 @@
 namespace tavoctl {
 namespace {
 
-constexpr char name_help[] = "the account, in any case";
-
 // What add and modify can say of an account.
 class Facts {
   public:
@@ -107,7 +105,7 @@ class UserAdd : public Verb {
 // A verb that changes an account that is there.
 class OneUser : public Verb {
   public:
-    void Declare(Arguments &arguments) override { arguments.Text("NAME", name_, name_help, UserNames); }
+    void Declare(Arguments &arguments) override { arguments.Text("NAME", name_, user_help, UserNames); }
 
   protected:
     template <class Edit>
@@ -184,7 +182,7 @@ class UserDelete : public Verb {
 
     void Declare(Arguments &arguments) override
     {
-        arguments.Texts("NAME", names_, name_help, 1, UserNames);
+        arguments.Texts("NAME", names_, user_help, 1, UserNames);
         arguments.Flag("--system", system_, "also accounts that the system needs");
     }
 

@@ -35,6 +35,7 @@ User ReadUser(const std::string &name);                 // throws a Failure, als
 std::optional<User> FindUserById(int uid);
 
 // The names that the library lists, in its order; for completion too.
+inline constexpr char user_help[] = "the account, in any case";
 std::vector<std::string> UserNames();
 std::vector<std::string> UserNames(const std::string &prefix, const std::string &part);
 

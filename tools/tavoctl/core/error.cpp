@@ -22,7 +22,7 @@ const ErrorCode *Understood(const std::string &text)
     return error == std::errc{} && stop == end ? FindErrorCode(code) : FindErrorCode(text);
 }
 
-std::vector<std::string> Names()
+std::vector<std::string> ErrorNames()
 {
     std::vector<std::string> names;
     for (const ErrorCode &row : ErrorCodes())
@@ -56,7 +56,7 @@ class ErrorExplain : public Verb {
 
     void Declare(Arguments &arguments) override
     {
-        arguments.Text("CODE", code_, "a number, decimal or with 0x in front, or a name", Names);
+        arguments.Text("CODE", code_, "a number, decimal or with 0x in front, or a name", ErrorNames);
     }
 
     int Run(const Call &call) override

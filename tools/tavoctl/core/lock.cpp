@@ -15,7 +15,7 @@
 namespace tavoctl {
 namespace {
 
-std::vector<std::string> Names()
+std::vector<std::string> LockNames()
 {
     std::vector<std::string> names;
     for (const TLIBLOCKFILE *lock = rgslckList; lock->fLockBit; ++lock)
@@ -77,7 +77,7 @@ class LockRun : public Verb {
 
     void Declare(Arguments &arguments) override
     {
-        arguments.Text("LOCKS", locks_, "names, joined by commas, or the sum of their bits, such as 0x30", Names);
+        arguments.Text("LOCKS", locks_, "names, joined by commas, or the sum of their bits, such as 0x30", LockNames);
         arguments.Flag("--shared", shared_, "with others who share");
         arguments.Number("--timeout", "SECONDS", wait_, "how long to wait for them; 0: not at all (5)");
         arguments.Program(program_);

@@ -27,6 +27,9 @@ struct Failure {
 // The failure that the library has just reported.
 Failure LibraryFailure(std::string attempted, std::string hint = {});
 
+// The hint of a failure for which the library sets no code.
+inline constexpr char log_hint[] = "look at the system log";
+
 // An argument that tavoctl itself refuses.
 Failure UsageFailure(std::string attempted, std::string reason, std::string hint = {});
 

@@ -12,12 +12,6 @@
 namespace tavoctl {
 namespace {
 
-template <std::size_t Size>
-void Put(char (&field)[Size], const std::string &text)
-{
-    std::snprintf(field, Size, "%s", text.c_str());
-}
-
 // "dhcp", "192.0.2.10/24" or "192.0.2.10/255.255.255.0".
 TAVONETCARD WantedCard(const std::string &wanted)
 {

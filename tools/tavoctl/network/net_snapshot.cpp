@@ -40,12 +40,6 @@ std::string Setting(const std::string &path, const char *key)
     return TLIBFileGetKeyValue(path.c_str(), key, value, sizeof value, 0) > 0 ? value : "";
 }
 
-template <std::size_t Size>
-void Put(char (&field)[Size], const std::string &text)
-{
-    std::snprintf(field, Size, "%s", text.c_str());
-}
-
 bool WriteNew(int fd, const std::string &text, mode_t mode)
 {
     std::size_t done = 0;

@@ -4,6 +4,7 @@
 
 #include "tavo_net.h"
 
+#include <cstdio>
 #include <optional>
 #include <string>
 
@@ -14,6 +15,13 @@ void CheckInterface(const std::string &attempted, const std::string &interface);
 
 // The first interface; throws a Failure when there is none.
 TAVONETCARD FirstCard(const std::string &attempted);
+
+// Fills a field of a record; what does not fit is cut.
+template <std::size_t Size>
+void Put(char (&field)[Size], const std::string &text)
+{
+    std::snprintf(field, Size, "%s", text.c_str());
+}
 
 class NetSnapshot {
   public:

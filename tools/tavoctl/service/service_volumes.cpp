@@ -71,7 +71,7 @@ class ServiceVolume : public Verb {
             TAVOServiceSettingGet(folder, &share);
             if (TAVOServiceShareGen(folder, volume.c_str(), path, sizeof path) < 0)
                 throw LibraryFailure("name the folder on " + volume);
-            table.Add({share.szLink, Known(share.szVolume), path});
+            table.Add({share.szLink, Known(std::string(share.szVolume)), path});
         }
         call.Print(table);
         return exit_done;

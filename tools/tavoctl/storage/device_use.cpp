@@ -19,7 +19,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-std::optional<dev_t> NumberOf(const std::string &path)
+std::optional<dev_t> DeviceNumber(const std::string &path)
 {
     struct stat state;
     if (::stat(path.c_str(), &state) != 0 || !S_ISBLK(state.st_mode))
@@ -31,14 +31,14 @@ std::optional<dev_t> NumberOf(const std::string &path)
 std::string MountOf(dev_t number)
 {
     for (const Mount &mount : Mounts()) {
-        if (NumberOf(mount.source) == number)
+        if (DeviceNumber(mount.source) == number)
             return " is mounted on " + mount.place;
     }
     std::ifstream swaps("/proc/swaps");
     std::string line;
     std::getline(swaps, line);  // the heading
     while (std::getline(swaps, line)) {
-        if (NumberOf(line.substr(0, line.find_first_of(" \t"))) == number)
+        if (DeviceNumber(line.substr(0, line.find_first_of(" \t"))) == number)
             return " is swap space";
     }
     return "";
@@ -80,7 +80,7 @@ std::vector<Mount> Mounts()
 
 std::string UseOf(const std::string &device)
 {
-    const auto number = NumberOf(device);
+    const auto number = DeviceNumber(device);
     if (!number)
         return "";
     const fs::path place = "/sys/dev/block/" + std::to_string(major(*number)) + ":" + std::to_string(minor(*number));
@@ -102,7 +102,7 @@ std::string UseOf(const std::string &device)
 void RefuseUsed(const std::vector<std::string> &devices, const std::string &attempted)
 {
     for (const std::string &device : devices) {
-        if (!NumberOf(device))
+        if (!DeviceNumber(device))
             throw NotFound(attempted + ": " + device, ERR_FILE_NOT_FOUND, "check the name");
         if (const std::string use = UseOf(device); !use.empty())
             throw Failure{.attempted = attempted, .reason = use, .hint = "free it first", .status = exit_busy};

@@ -16,7 +16,6 @@ namespace tavoctl {
 namespace {
 
 constexpr char group_help[] = "its name, vg1 or /dev/vg1";
-constexpr char log_hint[] = "look at the system log";
 
 struct FreeVolumes {
     void operator()(LVMPVLIST *list) const { LVMPvSBListFree(list); }

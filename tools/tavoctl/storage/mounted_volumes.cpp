@@ -16,7 +16,7 @@ namespace {
 constexpr std::string_view prefix = "/volume";
 
 // 0 for a path that is no volume's.
-int NumberOf(std::string_view path)
+int VolumeNumber(std::string_view path)
 {
     int number = 0;
     if (!path.starts_with(prefix))
@@ -38,7 +38,7 @@ std::vector<MountedVolume> MountedVolumes()
         throw Failure{.attempted = "list the mounted volumes", .reason = "/proc/self/mounts cannot be read"};
     std::map<int, MountedVolume> found;
     while (const mntent *mount = ::getmntent(mounts.get()))
-        if (const int number = NumberOf(mount->mnt_dir); number > 0)
+        if (const int number = VolumeNumber(mount->mnt_dir); number > 0)
             found[number] = {number, mount->mnt_dir, mount->mnt_fsname};  // the last one lies on top
     std::vector<MountedVolume> volumes;
     for (auto &[number, volume] : found)
@@ -57,7 +57,7 @@ MountedVolume FindVolume(int number)
 
 MountedVolume FindVolume(const std::string &number)
 {
-    const int value = NumberOf(std::string(prefix) + number);
+    const int value = VolumeNumber(std::string(prefix) + number);
     if (value <= 0)
         throw UsageFailure("find volume " + number, "it is no number of a volume");
     return FindVolume(value);

@@ -14,7 +14,6 @@ namespace {
 
 constexpr char array_help[] = "its name, md2 or /dev/md2";
 constexpr char member_help[] = "a partition or disk, sda3 or /dev/sda3";
-constexpr char log_hint[] = "look at the system log";
 
 bool Runs(const std::string &path)
 {

@@ -1,8 +1,8 @@
 // Which groups an enumeration lists.
-#ifndef TAVO_ACCOUNT_DETAIL_GROUP_ENUM_H
-#define TAVO_ACCOUNT_DETAIL_GROUP_ENUM_H
+#ifndef TAVO_ACCOUNT_DETAIL_GROUP_ENUMERATION_H
+#define TAVO_ACCOUNT_DETAIL_GROUP_ENUMERATION_H
 
-#include "account/detail/user_enum.h"
+#include "account/detail/user_enumeration.h"
 
 #include <optional>
 

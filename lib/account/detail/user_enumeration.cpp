@@ -1,5 +1,5 @@
 // Which accounts an enumeration lists.
-#include "account/detail/user_enum.h"
+#include "account/detail/user_enumeration.h"
 
 #include "account/detail/account_name.h"
 #include "account/detail/account_session.h"

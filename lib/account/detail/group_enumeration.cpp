@@ -1,5 +1,5 @@
 // Which groups an enumeration lists.
-#include "account/detail/group_enum.h"
+#include "account/detail/group_enumeration.h"
 
 #include "account/detail/account_name.h"
 #include "account/detail/account_session.h"

@@ -1,6 +1,6 @@
 // Which accounts an enumeration lists.
-#ifndef TAVO_ACCOUNT_DETAIL_USER_ENUM_H
-#define TAVO_ACCOUNT_DETAIL_USER_ENUM_H
+#ifndef TAVO_ACCOUNT_DETAIL_USER_ENUMERATION_H
+#define TAVO_ACCOUNT_DETAIL_USER_ENUMERATION_H
 
 #include "tavo_list.h"
 
