@@ -41,7 +41,8 @@ TAVO_API int TAVOEBoxInfoEnum(TAVOEBOX **ppBox);
 /* Returns 1 when the unit has power, else 0; 0 with ERR_BAD_PARAMETERS for NULL. */
 TAVO_API int TAVOEBoxIsPoweron(const TAVOEBOX *pBox);
 
-/* The largest size of an array member that the model uses, "raidsizelimit", in KiB; 0 without a limit. */
+/* The largest size of an array member that the model uses, "raidsizelimit", in KiB; 0 without a limit. A limit
+ * beyond an unsigned long (4 TiB on the appliance) is the largest one. */
 TAVO_API unsigned long RAIDSizeLimitGet(void);
 
 /* --- accounts --- */

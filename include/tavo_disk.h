@@ -184,10 +184,11 @@ TAVO_API int DiskSizeGet(const char *szPath, uint64_t *pcSector);
 TAVO_API int TAVODiskUSBGetInfo(const char *szName, uint64_t *pcMib);
 
 /* Splits a name at its trailing number: "sda3" into "sda" and 3. The number begins at a digit from 1 to 9, so "sda10"
- * gives 10 and "sda03" the name "sda0" and 3. At most cbBase - 1 characters of the name are kept; a name that is longer
- * has no number.
- * Returns the number; 0 without one; -1 when the path begins with a digit from 1 to 9 or is empty; -1 with
- * ERR_BAD_PARAMETERS when an argument is NULL or cbBase is below 2. */
+ * gives 10 and "sda03" the name "sda0" and 3. The name needs cbBase - 1 characters or
+ * fewer.
+ * Returns the number; 0 without one, when the name is the whole path; -1, with szBase as it was, when the path begins with
+ * a digit from 1 to 9, is empty, or its name or number is too long; -1 with ERR_BAD_PARAMETERS when an argument is NULL or
+ * cbBase is below 2. */
 TAVO_API int TAVODiskPartitionNumGet(const char *szPath, char *szBase, int cbBase);
 
 /* Gives the path of the disk or partition that an open descriptor belongs to, as a heap text for free. The source is

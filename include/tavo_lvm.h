@@ -103,7 +103,8 @@ TAVO_API int LVMVgSBGet(const char *szVg, LVMVG *pVg);
 TAVO_API LVMVGINFO *LVMVgInfoAlloc(void);
 TAVO_API void LVMVgInfoFree(LVMVGINFO *pInfo);
 
-/* Fills the record with a group and its physical volumes. Returns 0, or -1 with the record as it was. */
+/* Fills the record with a group and its physical volumes. Returns 0, or -1 with the record as it was: also for a group
+ * without a UUID, which devices outside every group would match. */
 TAVO_API int LVMVgSB2Info(const LVMVG *pVg, LVMVGINFO *pInfo);
 
 /* Finds the first group that has the key's path, or holds its physical volume: 1 and the record, which stays the list's, in
@@ -112,7 +113,7 @@ TAVO_API int LVMVgSBListSearch(const LVMVGLIST *pList, const LVMVGKEY *pKey, LVM
 
 /* --- logical volumes --- */
 
-/* Makes the volume that fills the group. Returns 0 or -1. */
+/* Makes the volume that fills the group; what an earlier volume left at that place is wiped. Returns 0 or -1. */
 TAVO_API int LVMLvCreate(const char *szVg, const char *szLv);
 
 /* Makes physical volumes of all devices, in order, a group of them, and its volume. The group's UUID goes into szUuid unless

@@ -6,10 +6,10 @@
 
 extern "C" int TAVOMaxDiskGet(void)
 {
-    constexpr unsigned long usual = 4;
-    constexpr unsigned long most = 10;  // "/dev/sda" to "/dev/sdj"; the letters after them are external ports
+    constexpr uint64_t usual = 4;
+    constexpr uint64_t most = 10;  // "/dev/sda" to "/dev/sdj"; the letters after them are external ports
     return Guard([&] {
-        const unsigned long bays = tavo::ModelNumber("maxdisks").value_or(usual);
+        const uint64_t bays = tavo::ModelNumber("maxdisks").value_or(usual);
         return static_cast<int>(bays == 0 ? usual : bays < most ? bays : most);
     });
 }

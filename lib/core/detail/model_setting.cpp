@@ -24,15 +24,17 @@ bool ModelHas(const char *key)
     return value && ::strcasecmp(value->c_str(), "yes") == 0;
 }
 
-std::optional<unsigned long> ModelNumber(const char *key)
+std::optional<uint64_t> ModelNumber(const char *key)
 {
     const std::optional<std::string> value = ModelSetting(key);
     if (!value)
         return std::nullopt;
-    unsigned long number = 0;
+    uint64_t number = 0;
     const char *const end = value->data() + value->size();
     const auto [stop, error] = std::from_chars(value->data(), end, number);
-    return error == std::errc{} && stop == end ? std::optional(number) : std::nullopt;
+    if (stop != end || error == std::errc::invalid_argument)
+        return std::nullopt;
+    return error == std::errc{} ? number : UINT64_MAX;
 }
 
 }  // namespace tavo

@@ -2,6 +2,7 @@
 #ifndef TAVO_CORE_DETAIL_MODEL_SETTING_H
 #define TAVO_CORE_DETAIL_MODEL_SETTING_H
 
+#include <cstdint>
 #include <optional>
 #include <string>
 
@@ -15,8 +16,9 @@ std::optional<std::string> ModelSetting(const char *key);
 // Whether the model has what the key is about: "yes".
 bool ModelHas(const char *key);
 
-// A number of the model, strictly decimal; empty when the model does not say or says something else.
-std::optional<unsigned long> ModelNumber(const char *key);
+// A number of the model, strictly decimal; UINT64_MAX for a larger one. Empty when the model does not say or says something
+// else.
+std::optional<uint64_t> ModelNumber(const char *key);
 
 }  // namespace tavo
 

@@ -16,7 +16,8 @@ extern "C" int TAVOIDiskFlushBuffer(const char *szPath)
     return tavo::WithRawDisk(szPath, [&](const tavo::RawDisk &disk) {
         const int fd = disk.Descriptor();
         ::sync();
-        const int failures = ::fsync(fd) | ::fdatasync(fd);
+        const bool synced = ::fsync(fd) == 0;
+        const bool data_synced = ::fdatasync(fd) == 0;
         ::sync();
         if (::ioctl(fd, BLKFLSBUF, nullptr) != 0) {
             LogError("%s:%d ioctl(fd, BLKFLSBUF, NULL) fail");
@@ -25,6 +26,6 @@ extern "C" int TAVOIDiskFlushBuffer(const char *szPath)
         ::sync();
         const int result = disk.Command(DISK_COMMAND_FLUSH, nullptr);
         ::sync();
-        return failures ? -1 : result;
+        return synced && data_synced ? result : -1;
     });
 }

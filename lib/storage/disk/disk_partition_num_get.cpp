@@ -11,13 +11,13 @@ extern "C" int TAVODiskPartitionNumGet(const char *szPath, char *szBase, int cbB
     if (!szPath || !szBase || cbBase < 2)
         return Fail(ERR_BAD_PARAMETERS);
     // A 0 stays in the base: only 1 to 9 begin a number.
-    const size_t whole = std::strcspn(szPath, "123456789");
-    const size_t kept = whole < static_cast<size_t>(cbBase) ? whole : static_cast<size_t>(cbBase) - 1;
-    if (kept == 0)
+    const size_t base = std::strcspn(szPath, "123456789");
+    if (base == 0 || base >= static_cast<size_t>(cbBase))
         return -1;
-    std::memcpy(szBase, szPath, kept);
-    szBase[kept] = 0;
     int number = 0;
-    std::from_chars(szPath + kept, szPath + std::strlen(szPath), number);
+    if (szPath[base] && std::from_chars(szPath + base, szPath + std::strlen(szPath), number).ec != std::errc{})
+        return -1;
+    std::memcpy(szBase, szPath, base);
+    szBase[base] = 0;
     return number;
 }

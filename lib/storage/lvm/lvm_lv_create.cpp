@@ -18,7 +18,11 @@ extern "C" int LVMLvCreate(const char *szVg, const char *szLv)
         return -1;
     }
     return Guard([&] {
-        const auto result = tavo::RunDiskCommand("/sbin/lvcreate %s -n %s -l100%%VG > /dev/null 2>&1", szVg, szLv);
+        auto result = tavo::RunDiskCommand("/sbin/lvcreate %s -n %s -l100%%VG > /dev/null 2>&1", szVg, szLv);
+        // Where the volume goes an earlier one may have been: then lvcreate asks whether to wipe the file system that it
+        // finds. Only free extents of the group are taken, so nothing in use can be meant.
+        if (result.status != 0)
+            result = tavo::RunDiskCommand("/sbin/lvcreate -y %s -n %s -l100%%VG > /dev/null 2>&1", szVg, szLv);
         if (result.status != 0) {
             LogError("%s:%d Failed to '%s'", result.command);
             return -1;

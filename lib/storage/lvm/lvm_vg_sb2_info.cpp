@@ -10,7 +10,8 @@
 
 extern "C" int LVMVgSB2Info(const LVMVG *pVg, LVMVGINFO *pInfo)
 {
-    if (!pVg || !pInfo) {
+    // Devices outside every group have the empty UUID.
+    if (!pVg || !pInfo || pVg->szUuid[0] == 0) {
         LogError("%s:%d Bad parameters");
         return -1;
     }

@@ -116,6 +116,10 @@ extern "C" int RAIDCreate(const RAIDREQUEST *pRequest)
             return -1;
         }
         TAVORAIDMdTuningPerformance(pRequest->szPath);
+        // A disk alone gets such an array, so that a second one can join it later.
+        if (pRequest->nSlot == 1 && !tavo::HasNoRedundancy(pRequest->fLevel))
+            LogDebug("%s:%d [Info] %s has one slot: it is normal, but loses everything with its disk",
+                     pRequest->szPath);
         return 0;
     });
 }

@@ -8,6 +8,19 @@
 #include <linux/major.h>
 #include <linux/raid/md_u.h>
 
+namespace {
+
+// States are compared whole: only the mask of RAIDDiskCount knows bits.
+int CountInState(const RAIDMEMBER *members, int state)
+{
+    int count = 0;
+    for (; members; members = members->pNext)
+        count += members->nState == state ? 1 : 0;
+    return count;
+}
+
+}  // namespace
+
 extern "C" int RAIDStatusDecide(const mdu_array_info_t *pArray, const RAIDMEMBER *pMembers, int *pStatus)
 {
     if (!pArray || !pStatus)
@@ -18,9 +31,9 @@ extern "C" int RAIDStatusDecide(const mdu_array_info_t *pArray, const RAIDMEMBER
         return -1;
     }
     const int parity = RAIDParityDiskCount(*level, pArray->raid_disks);
-    const int active = RAIDDiskCount(pMembers, RAID_MEMBER_ACTIVE);
+    const int active = CountInState(pMembers, RAID_MEMBER_ACTIVE);
     const int missing = pArray->raid_disks - active;
-    if (!pMembers || RAIDDiskCount(pMembers, RAID_MEMBER_FATAL) > 0)
+    if (!pMembers || CountInState(pMembers, RAID_MEMBER_FATAL) > 0)
         *pStatus = RAID_STATUS_CRASHED;
     else if (missing <= 0)
         *pStatus = RAID_STATUS_NORMAL;

@@ -13,6 +13,7 @@
 #include <gmock/gmock.h>
 
 #include <cerrno>
+#include <climits>
 #include <cstddef>
 #include <cstring>
 #include <memory>
@@ -207,13 +208,15 @@ TEST(Model, BaysAndLimits)
     const struct {
         const char *settings;
         int bays;
-        unsigned long limit;
+        uint64_t limit;
     } rows[] = {
         {"", 4, 0},
         {"maxdisks=\"6\"\nraidsizelimit=\"2147483648\"\n", 6, 2147483648},
         {"maxdisks=26\nraidsizelimit=\n", 10, 0},
         {"maxdisks=0\nraidsizelimit=-1\n", 4, 0},
         {"maxdisks=6x\n", 4, 0},
+        {"maxdisks=4294967297\nraidsizelimit=18446744073709551616\n", 10, ULONG_MAX},
+        {"raidsizelimit=4294967296\n", 4, sizeof(long) == 4 ? ULONG_MAX : uint64_t{1} << 32},
     };
     for (const auto &row : rows) {
         test::DeviceTree tree;
@@ -304,8 +307,8 @@ TEST(TAVODiskPartitionNumGet, Table)
         const char *base;
     } rows[] = {
         {"sda3", 16, 3, "sda"},     {"sda10", 16, 10, "sda"}, {"sda", 16, 0, "sda"}, {"sda03", 16, 3, "sda0"},
-        {"sda100", 16, 100, "sda"}, {"sdabcd5", 4, 0, "sda"}, {"3", 16, -1, "?"},    {"", 16, -1, "?"},
-        {"sda3", 2, 0, "s"},        {"sda3", 1, -1, "?"},
+        {"sda100", 16, 100, "sda"}, {"sdab5", 4, -1, "?"},    {"3", 16, -1, "?"},    {"", 16, -1, "?"},
+        {"sda", 3, -1, "?"},        {"sda3", 1, -1, "?"},     {"sda3", 4, 3, "sda"}, {"sda99999999999", 16, -1, "?"},
     };
     for (const auto &row : rows) {
         char base[16] = "?";

@@ -72,6 +72,12 @@ TEST_F(Lvm, Readers)
     EXPECT_STREQ(info->szVg, "/dev/vg0");
     EXPECT_STREQ(info->szUuid, vg.szUuid);
     EXPECT_STREQ(info->pslPvs->pszItem[1], "/dev/md3");
+    log_.Clear();
+    const LVMVG nameless = {};
+    EXPECT_EQ(LVMVgSB2Info(&nameless, info), -1) << "md4 is in no group";
+    EXPECT_EQ(info->nPv, 2);
+    EXPECT_THAT(log_.Texts(), ElementsAre(MatchesRegex("lvm_vg_sb2_info:[0-9]+ Bad parameters")));
+    log_.Clear();
     const LVMVGLIST node = {info, nullptr};
     LVMVGINFO *found = nullptr;
     const struct {
@@ -184,6 +190,19 @@ TEST_F(Lvm, CreateAllAtOnce)
     log_.Clear();
     EXPECT_EQ(LVMCreate(devices.get(), "/dev/vg9", "lv", nullptr, 0), -1);
     EXPECT_THAT(log_.Texts(), ElementsAre(MatchesRegex(".* failed to get VG superblock: /dev/vg9, ret = 0")));
+}
+
+TEST_F(Lvm, WipesWhatAnEarlierVolumeLeft)
+{
+    const std::string once = "/sbin/lvcreate /dev/vg9 -n lv -l100%VG > /dev/null 2>&1";
+    const std::string again = "/sbin/lvcreate -y /dev/vg9 -n lv -l100%VG > /dev/null 2>&1";
+    commands_.OnCommand([&](const std::string &command) -> test::CommandReply { return {command == once ? 5 : 0, ""}; });
+    EXPECT_EQ(LVMLvCreate("/dev/vg9", "lv"), 0);
+    EXPECT_THAT(commands_.Commands(), ElementsAre(once, again));
+    commands_.OnCommand([](const std::string &) -> test::CommandReply { return {5, ""}; });
+    log_.Clear();
+    EXPECT_EQ(LVMLvCreate("/dev/vg9", "lv"), -1);
+    EXPECT_THAT(log_.Texts(), ElementsAre(testing::HasSubstr("Failed to '" + again + "'")));
 }
 
 TEST_F(Lvm, ExpandTriesAll)

@@ -88,6 +88,8 @@ TEST(RAIDStatusDecide, Table)
         {5, 4, {1, 1, 1, 1}, RAID_STATUS_NORMAL},
         {5, 4, {1, 1, 1}, RAID_STATUS_DEGRADED},
         {5, 4, {1, 1, 1, 2}, RAID_STATUS_DEGRADED},
+        {5, 4, {1, 1, 1, 3}, RAID_STATUS_DEGRADED},
+        {5, 4, {1, 1, 1, 5}, RAID_STATUS_DEGRADED},
         {5, 4, {1, 1, 8, 8}, RAID_STATUS_CRASHED},
         {5, 4, {1, 1, 1, 1, 4}, RAID_STATUS_CRASHED},
         {5, 4, {}, RAID_STATUS_CRASHED},
@@ -461,8 +463,10 @@ TEST_F(Raid, CreateRunsExactlyTheseCommands)
         const RAIDREQUEST request = {"/dev/md2", row.version, row.level,     row.spare,
                                      row.slots,  row.bytes,   members.get(), row.sync};
         commands_.Clear();
+        log_.Clear();
         EXPECT_EQ(RAIDCreate(&request), 0);
         EXPECT_THAT(commands_.Commands(), ElementsAre(command));
+        EXPECT_EQ(log_.Lines().size(), row.level == RAID_LEVEL_1 && row.slots == 1 ? 1u : 0u) << "a mirror of one";
     }
     commands_.Clear();
     log_.Clear();
