@@ -131,9 +131,9 @@ TAVO_API int LVMRemoveLV(const char *szDevice);
 /* Removes the logical volumes of a group. szKind is "lv". Returns 0 or -1. */
 TAVO_API int LVMRemove(const char *szVg, const char *szKind);
 
-/* Removes every physical volume on a disk or a partition ("/dev/sd"): the appliance has them on arrays alone. One that is
- * mounted or otherwise in use is left, and logged. Does nothing on a model without LVM. Returns 0, or -1 when the physical
- * volumes cannot be listed. */
+/* Removes every physical volume on a disk or a partition ("/dev/sd"): the appliance has them on arrays alone. USB disks,
+ * and groups that reach onto one, stay. Does nothing on a model without LVM. Returns 0; -1 when the physical volumes cannot
+ * be listed, or, with nothing changed, when one of them is mounted or otherwise in use, which is logged. */
 TAVO_API int LVMCleanIllegal(void);
 
 TAVO_END_DECLS

@@ -82,12 +82,15 @@ TAVO_API int TAVOPartitionLayoutIdxGet(int version, int fRaid);
 TAVO_API int PartitionLayoutGet(int *pVersion);
 
 /* Creates partitions. flags are PARTITION_SYSTEM, PARTITION_DATA, see there (0: nothing is made); pVersion may be NULL for the version that
- * the system carries. What is on the disk is lost. Returns 0 or -1. */
+ * the system carries. What is on the disk is lost. Returns 0 or -1; nothing is changed while something uses the disk
+ * (PARTITION_DATA: partition 3), which is logged. */
 TAVO_API int PartitionCreate(const char *szDisk, int flags, const int *pVersion);
 
 /* Empties entries of the table and erases RAID superblocks of the partitions. PARTITION_DATA empties partitions 15 down
  * to 3 (one that is not there is passed over) and erases the superblock of partition 3; PARTITION_SYSTEM does both for
- * partitions 1 and 2 and leaves an empty table, without partition 3 too. Returns 0 or -1. */
+ * partitions 1 and 2 and leaves an empty table, without partition 3 too. The superblock of another partition that is
+ * emptied is erased first. Returns 0 or -1; nothing is changed while something uses one of the partitions that the call
+ * empties (PARTITION_SYSTEM empties all), which is logged. */
 TAVO_API int PartitionClean(const char *szDisk, int flags);
 
 /* Erases the RAID superblock of one partition. Returns 0 or -1. */

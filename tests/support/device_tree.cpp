@@ -155,6 +155,14 @@ extern "C" {
         return real(path, flags, mode);
     current->NoteOpen(path);
     char room[4096];
+    const int excluding = O_EXCL | O_CREAT;
+    if ((flags & excluding) == O_EXCL) {
+        std::strcat(const_cast<char *>(current->Place(path, room)), test::DeviceTree::kBusy);
+        if (::access(room, F_OK) == 0) {
+            errno = EBUSY;
+            return -1;
+        }
+    }
     return real(current->Place(path, room), flags, mode);
 }
 

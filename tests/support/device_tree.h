@@ -32,6 +32,10 @@ class DeviceTree {
     // A node whose device is not there: opening it gives ENXIO.
     void AddAbsent(const std::string &path);
 
+    // The kernel uses the device of this path: opening it exclusively gives EBUSY.
+    void AddBusy(const std::string &path) { Put(path + kBusy, ""), Put(path, ""); }
+    static constexpr const char *kBusy = ".busy";
+
     // Every path that was opened, in order, as the library named it.
     std::vector<std::string> Opened() const;
 

@@ -3,13 +3,17 @@
 
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
+#include "core/detail/text_fields.h"
 #include "storage/detail/device_name.h"
+#include "storage/detail/device_use.h"
+#include "storage/detail/kernel_text.h"
 #include "storage/detail/mount_table.h"
+#include "storage/detail/usb_id.h"
 #include "storage/detail/volume_name.h"
 
+#include <cstring>
 #include <memory>
-
-#include <glob.h>
+#include <vector>
 
 namespace {
 
@@ -26,26 +30,58 @@ bool IsMounted(std::string_view group)
     return false;
 }
 
-// Whether the kernel has a device on top of it: an active volume, of whatever group.
-bool IsHeld(const char *device)
+bool IsOnDisk(const LVMPV &pv)
 {
-    const std::string pattern = "/sys/class/block/" + std::string(tavo::LastPart(device)) + "/holders/*";
-    glob_t found = {};
-    const int error = ::glob(pattern.c_str(), 0, nullptr, &found);
-    ::globfree(&found);
-    return error != GLOB_NOMATCH;
+    return std::string_view(pv.szPv).starts_with("/dev/sd");
+}
+
+// A stick or a disk that somebody plugged in and wants back. Whatever sysfs does not know is taken for a bay's.
+bool IsOnUsb(const LVMPV &pv)
+{
+    return IsOnDisk(pv) && tavo::UsbIdOfDisk(tavo::WithoutNumber(tavo::WithoutDev(pv.szPv))).has_value();
+}
+
+// A group that reaches onto such a disk goes as a whole, or not at all.
+bool IsForeign(const LVMPVLIST *all, const LVMPV &pv)
+{
+    if (IsOnUsb(pv))
+        return true;
+    for (; pv.szVg[0] && all; all = all->pNext) {
+        if (std::strcmp(all->pv.szVg, pv.szVg) == 0 && IsOnUsb(all->pv))
+            return true;
+    }
+    return false;
+}
+
+// Whether the kernel has a device on top of it that is not a volume of its own group.
+bool IsHeldByOthers(const LVMPV &pv)
+{
+    const std::string text = tavo::HoldersOf(tavo::LastPart(pv.szPv));
+    for (const std::string_view holder : tavo::SplitFields(text)) {
+        const auto name = tavo::KernelText("/sys/class/block/" + std::string(holder) + "/dm/name");
+        const auto volume = name ? tavo::ParseVolumePath("/dev/mapper/" + *name) : std::nullopt;
+        if (name ? !volume || volume->group != tavo::LastPart(pv.szVg) : !holder.starts_with("dm-"))
+            return true;
+    }
+    return false;
+}
+
+bool IsInUse(const LVMPV &pv)
+{
+    if (tavo::IsGroupPath(pv.szVg) && IsMounted(pv.szVg))
+        LogError("%s:%d %s is in use: %s is mounted", pv.szPv, pv.szVg);
+    else if (IsHeldByOthers(pv))
+        LogError("%s:%d %s is in use", pv.szPv);
+    else
+        return false;
+    return true;
 }
 
 bool Remove(const LVMPV &pv)
 {
-    const bool has_group = tavo::IsGroupPath(pv.szVg);
-    if (has_group && IsMounted(pv.szVg)) {
-        LogError("%s:%d %s is in use: %s is mounted", pv.szPv, pv.szVg);
+    if (tavo::IsGroupPath(pv.szVg) && LVMRemove(pv.szVg, "lv") != 0)
         return false;
-    }
-    if (has_group && LVMRemove(pv.szVg, "lv") != 0)
-        return false;
-    if (IsHeld(pv.szPv)) {
+    if (!tavo::HoldersOf(tavo::LastPart(pv.szPv)).empty()) {
         LogError("%s:%d %s is in use", pv.szPv);
         return false;
     }
@@ -59,11 +95,22 @@ int Pass()
     if (LVMPvScan() != 0 || LVMPvSBEnum(&all) < 0)
         return -1;
     const std::unique_ptr<LVMPVLIST, decltype(&LVMPvSBListFree)> owner(all, LVMPvSBListFree);
-    int removed = 0;
+    std::vector<const LVMPV *> illegal;
     for (const LVMPVLIST *node = all; node; node = node->pNext) {
-        if (std::string_view(node->pv.szPv).starts_with("/dev/sd") && Remove(node->pv))
-            ++removed;
+        if (!IsOnDisk(node->pv))
+            continue;
+        if (IsForeign(all, node->pv))
+            LogDebug("%s:%d %s stays: it is on a USB disk, or of a group that is", node->pv.szPv);
+        else
+            illegal.push_back(&node->pv);
     }
+    for (const LVMPV *pv : illegal) {
+        if (IsInUse(*pv))
+            return -1;
+    }
+    int removed = 0;
+    for (const LVMPV *pv : illegal)
+        removed += Remove(*pv) ? 1 : 0;
     return removed;
 }
 

@@ -5,6 +5,7 @@
 #include "core/detail/log.h"
 #include "core/detail/model_setting.h"
 #include "storage/detail/device_name.h"
+#include "storage/detail/device_use.h"
 #include "storage/detail/partition_command.h"
 
 namespace {
@@ -12,6 +13,7 @@ namespace {
 constexpr unsigned kRaidMember = 0xFD;
 constexpr unsigned kLinux = 0x83;
 constexpr unsigned kSwap = 0x82;
+constexpr int kData = 3;
 
 int Report(const tavo::CommandResult &result)
 {
@@ -23,7 +25,7 @@ int Report(const tavo::CommandResult &result)
 
 int CreateData(const char *disk, const TAVOPARTLAYOUT &layout, bool raid)
 {
-    return Report(tavo::RunDiskCommand("/sbin/sfdisk -N%d -uS -q -f -j%llu -z-1 -t%x -F %s >/dev/null 2>&1", 3,
+    return Report(tavo::RunDiskCommand("/sbin/sfdisk -N%d -uS -q -f -j%llu -z-1 -t%x -F %s >/dev/null 2>&1", kData,
                                        uint64_t{layout.cGap}, raid ? kRaidMember : kLinux, disk));
 }
 
@@ -59,9 +61,17 @@ extern "C" int PartitionCreate(const char *szDisk, int flags, const int *pVersio
             LogError("%s:%d Failed to get partition layout: version=%d", version);
             return -1;
         }
+        const bool data = (flags & PARTITION_DATA) != 0;
+        if (!data && (flags & PARTITION_SYSTEM) == 0)
+            return 0;
+        // The empty table that the system's partitions begin with takes all others along.
+        const int first = data ? kData : 1;
+        const std::string used = tavo::UsedPartition(szDisk, first, data ? kData : tavo::kLastPartition);
+        if (!used.empty()) {
+            LogError("%s:%d %s", used);
+            return -1;
+        }
         const TAVOPARTLAYOUT &layout = grgAllTavoPartLayout[index];
-        if ((flags & PARTITION_DATA) != 0)
-            return CreateData(szDisk, layout, raid);
-        return (flags & PARTITION_SYSTEM) != 0 ? CreateSystem(szDisk, layout, raid) : 0;
+        return data ? CreateData(szDisk, layout, raid) : CreateSystem(szDisk, layout, raid);
     });
 }

@@ -5,6 +5,7 @@
 #include "core/detail/fault.h"
 #include "core/detail/log.h"
 #include "storage/detail/array_name.h"
+#include "storage/detail/member_size.h"
 
 extern "C" int RAIDAddRobustCheck(const RAIDINFO *pInfo, const char *szMember)
 {
@@ -14,9 +15,7 @@ extern "C" int RAIDAddRobustCheck(const RAIDINFO *pInfo, const char *szMember)
     const int result = DiskSizeGet(szMember, &sectors);
     if (result != 1)
         return Fail(result == 0 ? ERR_PATH_NOT_FOUND : ERR_SYS_UNKNOWN);
-    constexpr uint64_t rounding = 256;
-    constexpr uint64_t sector = 512;
-    if (sectors < (pInfo->cbMember + rounding) / sector) {
+    if (!tavo::HoldsMember(*pInfo, sectors)) {
         LogError("%s:%d '%s' is too small for '%s'", szMember, pInfo->szPath);
         return Fail(ERR_NOT_ENOUGH_SPACE);
     }

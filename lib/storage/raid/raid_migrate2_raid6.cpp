@@ -1,9 +1,13 @@
 // Turns a RAID 5 into a RAID 6.
+#include "tavo_disk.h"
 #include "tavo_raid.h"
 
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "storage/detail/array_name.h"
+#include "storage/detail/device_use.h"
+#include "storage/detail/member_size.h"
+#include "storage/detail/open_disk.h"
 #include "storage/detail/partition_command.h"
 
 namespace {
@@ -15,6 +19,24 @@ bool AddMembers(const RAIDINFO &info, const TLIBSZLIST &members, int first, int 
             return false;
     }
     return true;
+}
+
+// Whether one of them is in use, or is known to be too small: the level cannot be changed back.
+bool IsUnfit(const RAIDINFO &info, const TLIBSZLIST &members)
+{
+    for (int i = 0; i < members.nItem; ++i) {
+        const char *const member = members.pszItem[i];
+        uint64_t sectors = 0;
+        const std::string user = tavo::UserOf(member);
+        if (!user.empty())
+            LogError("%s:%d %s is in use: %s", member, user);
+        else if (tavo::HasNode(member) && DiskSizeGet(member, &sectors) == 1 && !tavo::HoldsMember(info, sectors))
+            LogError("%s:%d '%s' is too small for '%s'", member, info.szPath);
+        else
+            continue;
+        return true;
+    }
+    return false;
 }
 
 }  // namespace
@@ -30,6 +52,8 @@ extern "C" int RAIDMigrate2RAID6(const RAIDINFO *pInfo, const TLIBSZLIST *pslMem
         return Fail(ERR_BAD_PARAMETERS);
     }
     return Guard([&] {
+        if (IsUnfit(*pInfo, *pslMembers))
+            return -1;
         const auto result = tavo::RunDiskCommand("/bin/echo raid6  > /sys/block/md%d/md/level", *array);
         if (result.status != 0) {
             LogError("%s:%d Failed to do '%s', err=%d", result.command, result.status);

@@ -196,7 +196,9 @@ TEST_F(Lvm, WipesWhatAnEarlierVolumeLeft)
 {
     const std::string once = "/sbin/lvcreate /dev/vg9 -n lv -l100%VG > /dev/null 2>&1";
     const std::string again = "/sbin/lvcreate -y /dev/vg9 -n lv -l100%VG > /dev/null 2>&1";
-    commands_.OnCommand([&](const std::string &command) -> test::CommandReply { return {command == once ? 5 : 0, ""}; });
+    commands_.OnCommand([&](const std::string &command) -> test::CommandReply {
+        return {command == once ? 5 : 0, ""};
+    });
     EXPECT_EQ(LVMLvCreate("/dev/vg9", "lv"), 0);
     EXPECT_THAT(commands_.Commands(), ElementsAre(once, again));
     commands_.OnCommand([](const std::string &) -> test::CommandReply { return {5, ""}; });
@@ -257,20 +259,39 @@ TEST_F(Lvm, CleansDisksThatNobodyUses)
             std::fclose(std::fopen(marker.c_str(), "w"));
         if (!command.starts_with("/sbin/pvs "))
             return {command.find("vg4") != command.npos ? 5 : 0, ""};
-        const std::string rest = "  /dev/sdb3|vg2|u|1\n  /dev/sdc|root|u|1\n  /dev/md2|vg3|u|1\n  /dev/sdd|vg4|u|1\n";
+        const std::string rest =
+            "  /dev/sdb3|vg2|u|2\n  /dev/sdk1|vg2|u|2\n  /dev/sdc|root|u|1\n  /dev/md2|vg3|u|1\n  /dev/sdd|vg4|u|1\n";
         return {0, (::access(marker.c_str(), F_OK) == 0 ? "" : "  /dev/sda3|vg1|u|1\n") + rest};
     });
-    tree_.Put("/proc/mounts", "/dev/mapper/vg2-lv /volume2 ext4 rw 0 0\n");
-    tree_.Put("/sys/class/block/sdc/holders/dm-0", "");
-    EXPECT_EQ(LVMCleanIllegal(), 0);
     const std::string scan = "/sbin/pvscan > /dev/null 2>&1";
     const std::string pvs = kPvs + " 2>/dev/null";
     const std::string busy = "/sbin/lvremove -f /dev/vg4 > /dev/null 2>&1";
+    tree_.Put("/sys/class/block/sdc/holders/dm-0", "");
+    // What is in use is seen before anything is removed.
+    tree_.Put("/proc/mounts", "/dev/mapper/vg2-lv /volume2 ext4 rw 0 0\n");
+    EXPECT_EQ(LVMCleanIllegal(), -1);
+    EXPECT_THAT(log_.Texts(),
+                ElementsAre(MatchesRegex("lvm_clean_illegal:[0-9]+ /dev/sdb3 is in use: /dev/vg2 is mounted")));
+    tree_.Put("/proc/mounts", "");
+    tree_.Put("/sys/class/block/sdc/holders/md1", "");
+    EXPECT_EQ(LVMCleanIllegal(), -1);
+    tree_.Remove("/sys/class/block/sdc/holders/md1");
+    tree_.Put("/sys/class/block/dm-0/dm/name", "other-lv\n");
+    EXPECT_EQ(LVMCleanIllegal(), -1);
+    EXPECT_THAT(log_.Texts(), Contains(MatchesRegex("lvm_clean_illegal:[0-9]+ /dev/sdc is in use")).Times(2));
+    EXPECT_THAT(commands_.Commands(), ElementsAre(scan, pvs, scan, pvs, scan, pvs));
+    tree_.Remove("/sys/class/block/dm-0");
+    commands_.Clear();
+
+    // The group on sdb3 reaches onto a stick.
+    tree_.Put("/sys/block/sdk/device/idVendor", "0951\n");
+    tree_.Put("/sys/block/sdk/device/idProduct", "1666\n");
+    EXPECT_EQ(LVMCleanIllegal(), 0);
     EXPECT_THAT(commands_.Commands(),
                 ElementsAre(scan, pvs, "/sbin/lvremove -f /dev/vg1 > /dev/null 2>&1",
                             "/sbin/pvremove -ff -y /dev/sda3 > /dev/null 2>&1", busy, scan, pvs, busy));
-    EXPECT_THAT(log_.Texts(), Contains(MatchesRegex("lvm_clean_illegal:[0-9]+ /dev/sdb3 is in use.*")));
-    EXPECT_THAT(log_.Texts(), Contains(MatchesRegex("lvm_clean_illegal:[0-9]+ /dev/sdc is in use")));
+    EXPECT_THAT(log_.Texts(), Contains(MatchesRegex("lvm_clean_illegal:[0-9]+ /dev/sdk1 stays: .* USB .*")));
+    EXPECT_THAT(log_.Texts(), Contains(MatchesRegex("lvm_clean_illegal:[0-9]+ /dev/sdb3 stays: .*")));
     ::unlink(marker.c_str());
     commands_.OnCommand([](const std::string &) -> test::CommandReply { return {5, ""}; });
     EXPECT_EQ(LVMCleanIllegal(), -1);

@@ -13,6 +13,7 @@
 #include <gmock/gmock.h>
 
 #include <cstring>
+#include <functional>
 #include <map>
 
 #include <fcntl.h>
@@ -289,6 +290,90 @@ TEST_F(Partitions, CleanRunsExactlyTheseCommands)
     EXPECT_EQ(PartitionCleanRAID("/dev/sdb", 0), -1);
 }
 
+TEST_F(Partitions, WhatIsInUseIsNotHalfCleaned)
+{
+    const int version = 7;
+    const struct {
+        const char *busy;  // opened by the kernel itself
+        const char *held;  // has a holder
+        int clean_data, clean_system, create_data, create_system;
+        const char *log;
+    } rows[] = {
+        {"sdb1", "", 0, -1, 0, -1, "/dev/sdb1 is in use: a file system or swap"},
+        {"", "sdb2/holders/md1", 0, -1, 0, -1, "/dev/sdb2 is in use: md1"},
+        {"", "sdb3/holders/md2", -1, -1, -1, -1, "/dev/sdb3 is in use: md2"},
+        {"sdb5", "", -1, -1, 0, -1, "/dev/sdb5 is in use: a file system or swap"},
+        {"sdb", "", -1, -1, -1, -1, "/dev/sdb is in use: a file system or swap"},
+        {"", "sdb/holders/md9", -1, -1, -1, -1, "/dev/sdb is in use: md9"},
+        {"sdc1", "sdc3/holders/md2", 0, 0, 0, 0, ""},
+    };
+    for (const auto &row : rows) {
+        for (const char *name : {"sdb", "sdb1", "sdb2", "sdb3", "sdb5"})
+            tree_.Remove(std::string("/dev/") + name + test::DeviceTree::kBusy);
+        tree_.Remove("/sys/class/block");
+        if (*row.busy)
+            tree_.AddBusy(std::string("/dev/") + row.busy);
+        if (std::string(row.busy).size() == 4)
+            tree_.AddBusy("/dev/" + std::string(row.busy, 3));  // as the kernel has it for the whole of such a disk
+        if (*row.held)
+            tree_.Put(std::string("/sys/class/block/") + row.held, "");
+        const std::pair<int, std::function<int()>> calls[] = {
+            {row.clean_data,
+             [] {
+                 return PartitionClean("/dev/sdb", PARTITION_DATA);
+             }},
+            {row.clean_system,
+             [] {
+                 return PartitionClean("/dev/sdb", PARTITION_SYSTEM);
+             }},
+            {row.create_data,
+             [&] {
+                 return PartitionCreate("/dev/sdb", PARTITION_DATA, &version);
+             }},
+            {row.create_system,
+             [&] {
+                 return PartitionCreate("/dev/sdb", PARTITION_SYSTEM, &version);
+             }},
+        };
+        for (const auto &[result, call] : calls) {
+            commands_.Clear();
+            log_.Clear();
+            EXPECT_EQ(call(), result) << row.busy << row.held;
+            EXPECT_EQ(commands_.Commands().empty(), result == -1);
+            EXPECT_THAT(log_.Texts(), result == -1 ? testing::Matcher<std::vector<std::string>>(
+                                                         ElementsAre(testing::HasSubstr(row.log)))
+                                                   : testing::Matcher<std::vector<std::string>>(IsEmpty()));
+        }
+    }
+}
+
+TEST_F(Partitions, SuperblocksThatTheCommandsWouldMissAreErasedFirst)
+{
+    for (const char *name : {"/dev/sdb1", "/dev/sdb2", "/dev/sdb3", "/dev/sdb5", "/dev/sdb6"})
+        tree_.Put(name, "");
+    commands_.OnCommand([](const std::string &command) -> test::CommandReply {
+        const bool raid =
+            command == "/sbin/mdadm -E /dev/sdb2 2>/dev/null" || command == "/sbin/mdadm -E /dev/sdb6 2>/dev/null";
+        return {0, raid ? std::string(test::Capture("mdadm_E_1.2_raid5-mdadm-4.2")) : ""};
+    });
+    EXPECT_EQ(PartitionClean("/dev/sdb", PARTITION_SYSTEM | PARTITION_DATA), 0);
+    std::vector<std::string> commands = commands_.Commands();
+    ASSERT_GT(commands.size(), 6u);
+    commands.resize(6);
+    EXPECT_THAT(commands,
+                ElementsAre("/sbin/mdadm -E /dev/sdb2 2>/dev/null",
+                            "/sbin/mdadm --zero-superblock /dev/sdb2 > /dev/null 2>&1",
+                            "/sbin/mdadm -E /dev/sdb5 2>/dev/null", "/sbin/mdadm -E /dev/sdb6 2>/dev/null",
+                            "/sbin/mdadm --zero-superblock /dev/sdb6 > /dev/null 2>&1",
+                            "/sbin/sfdisk -N15 -q -f --no-reread -o0 -z0 -t0 -F -D /dev/sdb > /dev/null 2>&1"));
+    commands_.OnCommand([](const std::string &command) -> test::CommandReply {
+        return {command.find("--zero") != command.npos, std::string(test::Capture("mdadm_E_1.2_raid5-mdadm-4.2"))};
+    });
+    commands_.Clear();
+    EXPECT_EQ(PartitionClean("/dev/sdb", PARTITION_SYSTEM), -1) << "it cannot be erased";
+    EXPECT_EQ(commands_.Commands().size(), 2u);
+}
+
 TEST_F(Partitions, ExtendedIsOneTypeAlone)
 {
     const struct {
@@ -413,10 +498,16 @@ TEST(PartitionsOnAnImage, EveryLayoutIsRecognisedAfterItsCreation)
     if (test::RootLacks("foreign-exec"))
         GTEST_SKIP() << "writes to /dev/sda: only in an appliance root that runs the partitioning tool";
     const test::CapturedLog log;
-    for (const TAVOPARTLAYOUT &layout : grgAllTavoPartLayout) {
+    // The second is larger than an MS-DOS table describes, so its table keeps a copy in the last 33 sectors.
+    const struct {
+        uint64_t sectors, end;
+    } disks[] = {{8 << 21, 8 << 21}, {5860533168, 5860533168 - 33}};
+    for (size_t i = 0; i < 2 * std::size(grgAllTavoPartLayout); ++i) {
+        const TAVOPARTLAYOUT &layout = grgAllTavoPartLayout[i / 2];
+        const auto &disk = disks[i % 2];
         test::WriteFile("/etc.defaults/tavoinfo.conf", layout.fRaid ? "supportraid=yes\n" : "supportraid=no\n");
         test::WriteFile("/dev/sda", "");
-        ASSERT_EQ(::truncate("/dev/sda", off_t{8} << 30), 0);
+        ASSERT_EQ(::truncate("/dev/sda", static_cast<off_t>(disk.sectors * 512)), 0);
         const int raid = static_cast<int>(layout.fRaid);
         const int version = layout.nVersion;
         EXPECT_EQ(BlTAVOCheckPartitionLayout("/dev/sda", raid, nullptr), 0);
@@ -432,8 +523,11 @@ TEST(PartitionsOnAnImage, EveryLayoutIsRecognisedAfterItsCreation)
         const int64_t data = RCPartitionConfigs(3, "/dev/sda", &start, &type);
         EXPECT_EQ(start, static_cast<int64_t>(layout.place2.nStart + layout.place2.cSector +
                                               static_cast<int64_t>(layout.cGap)));
-        EXPECT_EQ(start + data, int64_t{8} << 21) << "to the end of the disk";
+        EXPECT_EQ(static_cast<uint64_t>(start + data), disk.end);
         EXPECT_EQ(type, layout.place3.nType);
+        int kind = 0;
+        EXPECT_EQ(PartitionTableTypeGet("/dev/sda", &kind), 0);
+        EXPECT_EQ(kind, i % 2 == 0 ? PARTITION_TABLE_MBR : PARTITION_TABLE_GPT);
         PartitionClean("/dev/sda", PARTITION_DATA);
         EXPECT_EQ(RCPartitionConfigs(3, "/dev/sda", nullptr, nullptr), -1);
         EXPECT_EQ(BlTAVOCheckPartitionLayout("/dev/sda", raid, nullptr), 1)
@@ -441,9 +535,6 @@ TEST(PartitionsOnAnImage, EveryLayoutIsRecognisedAfterItsCreation)
         EXPECT_EQ(PartitionClean("/dev/sda", PARTITION_SYSTEM), 0);
         EXPECT_EQ(BlTAVOCheckPartitionLayout("/dev/sda", raid, nullptr), 0);
     }
-    int kind = 0;
-    EXPECT_EQ(PartitionTableTypeGet("/dev/sda", &kind), 0);
-    EXPECT_EQ(kind, PARTITION_TABLE_MBR);
     ::unlink("/dev/sda");
 }
 

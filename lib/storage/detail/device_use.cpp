@@ -1,0 +1,56 @@
+// What the kernel has on top of a disk or partition.
+#include "storage/detail/device_use.h"
+
+#include "core/detail/open_file.h"
+#include "storage/detail/device_name.h"
+
+#include <glob.h>
+
+namespace tavo {
+namespace {
+
+std::string Sentence(const std::string &path, const std::string &user)
+{
+    return path + " is in use: " + user;
+}
+
+}  // namespace
+
+std::string HoldersOf(std::string_view name)
+{
+    const std::string pattern = "/sys/class/block/" + std::string(name) + "/holders/*";
+    std::string holders;
+    glob_t found = {};
+    if (::glob(pattern.c_str(), 0, nullptr, &found) == 0) {
+        for (size_t i = 0; i < found.gl_pathc; ++i)
+            holders.append(i > 0 ? " " : "").append(LastPart(found.gl_pathv[i]));
+    }
+    ::globfree(&found);
+    return holders;
+}
+
+std::string UserOf(const std::string &path)
+{
+    const std::string holders = HoldersOf(WithoutDev(path));
+    if (!holders.empty())
+        return holders;
+    // For block devices this means: unless the kernel itself uses it.
+    return !OpenFd(path.c_str(), O_RDONLY | O_EXCL) && errno == EBUSY ? "a file system or swap" : "";
+}
+
+std::string UsedPartition(const std::string &disk, int first, int last)
+{
+    bool any = false;
+    for (int number = 1; number <= kLastPartition; ++number) {
+        const std::string path = disk + std::to_string(number);
+        const std::string user = UserOf(path);
+        if (!user.empty() && number >= first && number <= last)
+            return Sentence(path, user);
+        any = any || !user.empty();
+    }
+    // A disk counts as used when a partition of it is.
+    const std::string user = any ? HoldersOf(WithoutDev(disk)) : UserOf(disk);
+    return user.empty() ? "" : Sentence(disk, user);
+}
+
+}  // namespace tavo
