@@ -204,7 +204,8 @@ TAVO_API int RAIDDiskIsUsedByRAID(const char *szDisk, int *pnArray);
 /* Creates an array and tunes it. What is on the members is lost. */
 TAVO_API int RAIDCreate(const RAIDREQUEST *pRequest);
 
-/* Starts an array from the members that carry its UUID, or from the members of a record. */
+/* Starts an array from the members that carry its UUID, or from the members of a record. When not all members of the record
+ * are there, but enough of them that the array is degraded, it is started by their UUID. */
 TAVO_API int RAIDAssemble(const char *szPath, const char *szUuid);
 TAVO_API int RAIDAssembleByInfo(const RAIDINFO *pInfo);
 
@@ -226,14 +227,29 @@ TAVO_API int RAIDAdd(const RAIDINFO *pInfo, const char *szMember);
  *   ERR_SYS_UNKNOWN        its size cannot be read, or adding failed */
 TAVO_API int RAIDAddRobustCheck(const RAIDINFO *pInfo, const char *szMember);
 
-/* Removes a failed or spare member, and makes sure that it is gone. */
+/* Removes a failed or spare member, and makes sure that it is gone. A member whose disk was pulled has no node any more;
+ * its path is "/dev/" and the name that the kernel keeps for it, and it is removed whatever its state. */
 TAVO_API int RAIDRemoveDisk(const RAIDINFO *pInfo, const char *szMember);
+
+/* Puts a new disk into the place of a member of a RAID 1, 5, 6 or 10; the rebuild begins, RAIDRebuildingWait waits for it.
+ * szOld is the path of the member that goes: failed, a spare, or of a disk that was pulled; NULL for the only one that is
+ * failed or pulled, or, without one, for a free slot. szNew is the whole disk ("/dev/sdd"). It gets the partitions of the
+ * system as the disk of another member has them, unless it has them already, and the one of the same number joins the
+ * array; in an array of whole disks the disk does. What was on them is lost, superblocks included. Log lines say what was
+ * done.
+ *   ERR_BAD_PARAMETERS     an array, level or path that is none of these
+ *   ERR_NOT_ENOUGH_SPACE   the new disk is too small; nothing has changed
+ *   ERR_SYS_UNKNOWN        mdadm did not take the new member; the old one is gone and the disk partitioned
+ * -1 without a code, logged, with nothing changed: the choice of the old one is not clear or it is in order, the new disk
+ * is in use, or no other member's disk shows how to partition it. */
+TAVO_API int RAIDReplaceDisk(const RAIDINFO *pInfo, const char *szOld, const char *szNew);
 
 /* Changes the number of slots. */
 TAVO_API int RAIDDevCountChange(const RAIDINFO *pInfo, int nSlot);
 
 /* Turns a RAID 5 into a RAID 6 with new members. With more than one it waits for the first one's rebuild, adds the others
- * and sets the number of slots to the number of new members minus 1, which mdadm refuses when that is fewer than before. */
+ * and sets the number of slots to the number of new members minus 1, which mdadm refuses when that is fewer than before.
+ * -1 with nothing changed when a new member is in use or too small. */
 TAVO_API int RAIDMigrate2RAID6(const RAIDINFO *pInfo, const TLIBSZLIST *pslMembers);
 
 /* Tells whether all members have room to use more of: returns 1 and the size to use on each, in KiB; 0; or -1 when a

@@ -34,6 +34,15 @@ constexpr std::optional<int> LevelOfKernel(int kernel)
     return std::nullopt;
 }
 
+constexpr std::optional<int> KernelOfLevel(int bit)
+{
+    for (const ArrayLevel &level : kArrayLevels) {
+        if (level.bit == bit)
+            return level.kernel;
+    }
+    return std::nullopt;
+}
+
 // RAID 5 for a name that is none: most arrays of the appliance are.
 constexpr int LevelOfName(std::string_view name)
 {

@@ -5,6 +5,7 @@
 
 #include "core/detail/fault.h"
 #include "core/detail/log.h"
+#include "storage/detail/open_disk.h"
 
 #include <algorithm>
 #include <cstdint>
@@ -17,6 +18,8 @@ extern "C" int RAIDExpansible(const RAIDINFO *pInfo, uint64_t *pcKibMember)
         return 0;
     uint64_t sectors = UINT64_MAX;
     for (const RAIDMEMBER *member = pInfo->pMembers; member; member = member->pNext) {
+        if (!tavo::HasNode(member->szPath))  // pulled: its replacement has to fit
+            continue;
         uint64_t size = 0;
         if (DiskSizeGet(member->szPath, &size) != 1) {
             LogError("%s:%d Failed to get the size of %s", member->szPath);
@@ -24,6 +27,8 @@ extern "C" int RAIDExpansible(const RAIDINFO *pInfo, uint64_t *pcKibMember)
         }
         sectors = std::min(sectors, size);
     }
+    if (sectors == UINT64_MAX)
+        return 0;
     uint64_t kib = sectors / 2;
     if (const unsigned long limit = RAIDSizeLimitGet())
         kib = std::min<uint64_t>(kib, limit);

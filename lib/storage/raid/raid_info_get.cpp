@@ -83,7 +83,7 @@ extern "C" int RAIDInfoGet(const char *szPath, RAIDINFO **ppInfo)
         info.nSlot = array.raid_disks;
         info.nWorking = array.working_disks;
         info.nFailed = array.failed_disks;
-        if (!tavo::ReadMembers(device.Get(), array, tavo::HasNoRedundancy(*level), &info.pMembers))
+        if (!tavo::ReadMembers(device.Get(), info.nArray, array, &info.pMembers))
             return Fail(ERR_OUT_OF_MEMORY);
         if (RAIDStatusDecide(&array, info.pMembers, &info.nStatus) != 0)
             return -1;

@@ -1,4 +1,5 @@
 // Arrays: read from the driver and the kernel's files, changed by exactly these commands.
+#include "tavo_partition.h"
 #include "tavo_raid.h"
 
 #include "support/captured_log.h"
@@ -15,6 +16,7 @@
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
 #include <memory>
 
 #include <linux/fs.h>
@@ -229,6 +231,23 @@ TEST_F(Raid, InfoOfAnArray)
     calls_.OnIoctl(Put(0, 3));
     tree_.Put("/sys/block/md5/md/array_state", "broken\n");
     EXPECT_EQ(Get()->nStatus, RAID_STATUS_CRASHED) << "its members keep their states";
+    EXPECT_THAT(log_.Lines(), IsEmpty());
+}
+
+// md5 whose second disk was pulled: neither a node nor its number is left, only md's name.
+TEST_F(Raid, AMemberWithoutANodeHasTheNameThatMdKeeps)
+{
+    calls_.OnIoctl(Put(5, 3, {6, 1, 6}));
+    for (const char *name : {"sda3", "sdb3", "sdc3"})
+        tree_.Put(std::string("/sys/block/md5/md/dev-") + name + "/state", "in_sync\n");
+    tree_.Remove("/sys/dev/block/8:19");
+    EXPECT_STREQ(Get()->pMembers->pNext->szPath, "/dev/sdb3");
+    // A number that says nothing about the name: the name that no other member has.
+    calls_.OnIoctl(FakeArray(5, 3, {{0, 8, 3, 6}, {1, 259, 7, 1}, {2, 8, 35, 6}}));
+    EXPECT_STREQ(Get()->pMembers->pNext->szPath, "/dev/sdb3");
+    calls_.OnIoctl(FakeArray(5, 3, {{0, 259, 7, 1}}));
+    tree_.Remove("/sys/block/md5/md");
+    EXPECT_STREQ(Get()->pMembers->szPath, "/dev/block/259:7");
     EXPECT_THAT(log_.Lines(), IsEmpty());
 }
 
@@ -466,7 +485,8 @@ TEST_F(Raid, CreateRunsExactlyTheseCommands)
         log_.Clear();
         EXPECT_EQ(RAIDCreate(&request), 0);
         EXPECT_THAT(commands_.Commands(), ElementsAre(command));
-        EXPECT_EQ(log_.Lines().size(), row.level == RAID_LEVEL_1 && row.slots == 1 ? 1u : 0u) << "a mirror of one";
+        const bool alone = row.level == RAID_LEVEL_1 && row.slots == 1;
+        EXPECT_THAT(log_.Texts(), Contains(testing::HasSubstr("/dev/md2 has one slot")).Times(alone ? 1 : 0));
     }
     commands_.Clear();
     log_.Clear();
@@ -547,9 +567,83 @@ TEST_F(Raid, RemovesAMemberForGood)
 {
     const RAIDINFO info = Record(RAID_LEVEL_5);
     tree_.Put("/sys/block/md5/md/dev-sdd3/state", "faulty\n");
+    tree_.Put("/dev/sdd3", "");
+    const std::string shortly = "/sbin/mdadm /dev/md5 -r /dev/sdd3 > /dev/null 2>&1";
+    const std::string by_path = "/sbin/mdadm --remove /dev/md5 /dev/sdd3 > /dev/null 2>&1";
+    const std::string by_name = "/sbin/mdadm --remove /dev/md5 sdd3 > /dev/null 2>&1";
     EXPECT_EQ(RAIDRemoveDisk(&info, "/dev/sdd3"), -1) << "it is still there";
-    EXPECT_THAT(commands_.Commands(), ElementsAre("/sbin/mdadm /dev/md5 -r /dev/sdd3 > /dev/null 2>&1",
-                                                  "/sbin/mdadm --remove /dev/md5 /dev/sdd3 > /dev/null 2>&1"));
+    EXPECT_THAT(commands_.Commands(), ElementsAre(shortly, by_path));
+
+    // Pulled: mdadm finds it by the kernel's name alone.
+    tree_.Remove("/dev/sdd3");
+    commands_.Clear();
+    const std::string held = tree_.Place("/sys/block/md5/md/dev-sdd3");
+    commands_.OnCommand([&](const std::string &command) -> test::CommandReply {
+        if (command == by_path)
+            return {1, ""};
+        if (command == by_name)
+            std::filesystem::remove_all(held);
+        return {0, ""};
+    });
+    EXPECT_EQ(RAIDRemoveDisk(&info, "/dev/sdd3"), 0);
+    EXPECT_THAT(commands_.Commands(), ElementsAre(shortly, by_path, by_name));
+
+    // Pulled while nothing was written: md does not know yet.
+    tree_.Put("/sys/block/md5/md/dev-sdd3/state", "in_sync\n");
+    commands_.Clear();
+    EXPECT_EQ(RAIDRemoveDisk(&info, "/dev/sdd3"), 0);
+    EXPECT_THAT(commands_.Commands(),
+                ElementsAre(shortly, by_path, "/sbin/mdadm /dev/md5 -f sdd3 > /dev/null 2>&1", by_name));
+}
+
+TEST_F(Raid, AssemblesWhatIsLeftOfTheMembers)
+{
+    const std::string superblock(test::Capture("mdadm_E_1.2_raid5-mdadm-4.2"));
+    const std::string all = "/sbin/mdadm -A /dev/md5 /dev/sda3 /dev/sdb3 /dev/sdc3 > /dev/null 2>&1";
+    const std::string stop = "/sbin/mdadm -S /dev/md5 > /dev/null 2>&1";
+    const std::string by_uuid = "/sbin/mdadm -A /dev/md5 -u b7e9ed0e:bf1ea758:5bf5fba6:7c359649 > /dev/null 2>&1";
+    RAIDMEMBER members[] = {{"/dev/sda3", 1, &members[1]}, {"/dev/sdb3", 1, &members[2]}, {"/dev/sdc3", 1, nullptr}};
+    RAIDINFO info = Record(RAID_LEVEL_5);
+    info.nSlot = 3;
+    info.pMembers = members;
+    const struct {
+        std::vector<std::string> there;  // nodes
+        std::vector<std::string> named;  // with a superblock of this array
+        const char *state;               // of the array after the first try
+        int third;                       // state of sdc3
+        int result;
+        std::vector<std::string> changes;
+    } rows[] = {
+        {{"a", "b"}, {"a", "b"}, "clear\n", 1, 0, {all, by_uuid}},
+        {{"a", "b", "c"}, {"a", "b"}, "inactive\n", 1, 0, {all, stop, by_uuid}},
+        {{"a", "b", "c"}, {"a", "b", "c"}, "clear\n", 2, 0, {all, by_uuid}},
+        {{"a", "b", "c"}, {"a", "b", "c"}, "clear\n", 1, -1, {all}},
+        {{"a", "c"}, {"a", "c"}, "clear\n", 2, -1, {all}},
+        {{"a"}, {"a"}, "inactive\n", 1, -1, {all, stop}},
+        {{}, {}, "clear\n", 1, -1, {all}},
+    };
+    for (const auto &row : rows) {
+        for (const char *letter : {"a", "b", "c"})
+            tree_.Remove(std::string("/dev/sd") + letter + "3");
+        for (const std::string &letter : row.there)
+            tree_.Put("/dev/sd" + letter + "3", "");
+        tree_.Put("/sys/block/md5/md/array_state", row.state);
+        members[2].nState = row.third;
+        commands_.Clear();
+        log_.Clear();
+        commands_.OnCommand([&](const std::string &command) -> test::CommandReply {
+            for (const std::string &letter : row.named) {
+                if (command == "/sbin/mdadm -E /dev/sd" + letter + "3 2>/dev/null")
+                    return {0, superblock};
+            }
+            return {command == all ? 1 : 0, ""};
+        });
+        EXPECT_EQ(RAIDAssembleByInfo(&info), row.result) << testing::PrintToString(row.there);
+        std::vector<std::string> changes = commands_.Commands();
+        std::erase_if(changes, [](const std::string &command) { return command.find(" -E ") != command.npos; });
+        EXPECT_EQ(changes, row.changes);
+        EXPECT_EQ(log_.Lines().size(), row.result == 0 ? 0u : 1u);
+    }
 }
 
 TEST_F(Raid, AddsOnlyMembersThatAreLargeEnough)
@@ -583,7 +677,8 @@ TEST_F(Raid, RoomToGrow)
     FakeArray sizes(5, 3, {});
     sizes.cbDevice = uint64_t{8} << 30;
     calls_.OnIoctl(sizes);
-    RAIDMEMBER member = {"/dev/sda3", 1, nullptr};
+    RAIDMEMBER pulled = {"/dev/sdb3", 8, nullptr};
+    RAIDMEMBER member = {"/dev/sda3", 1, &pulled};
     tree_.Put("/dev/sda3", "");
     const uint64_t kib = (8 << 20) - 1024;
     const struct {
@@ -649,8 +744,178 @@ TEST_F(Raid, MigratesToRaid6)
     commands_.Clear();
     EXPECT_EQ(RAIDMigrate2RAID6(&info, one.get()), 0);
     EXPECT_EQ(commands_.Commands().size(), 2u);
+    commands_.Clear();
+    tree_.Put("/dev/sde3", "");
+    FakeArray small(5, 3, {});
+    small.cbDevice = info.cbMember - 512;
+    calls_.OnIoctl(small);
+    EXPECT_EQ(RAIDMigrate2RAID6(&info, two.get()), -1) << "too small";
+    tree_.AddBusy("/dev/sdd3");
+    EXPECT_EQ(RAIDMigrate2RAID6(&info, one.get()), -1) << "in use";
+    EXPECT_THAT(commands_.Commands(), IsEmpty()) << "the level cannot be changed back";
+    EXPECT_THAT(log_.Texts(), ElementsAre(testing::HasSubstr("'/dev/sde3' is too small for '/dev/md5'"),
+                                          testing::HasSubstr("/dev/sdd3 is in use: a file system or swap")));
     const RAIDINFO mirror = Record(RAID_LEVEL_1);
     EXPECT_EQ(RAIDMigrate2RAID6(&mirror, one.get()), -1);
+}
+
+std::string LineOfPartition(int number, const TAVOPARTPLACE &place)
+{
+    return "/dev/x" + std::to_string(number) + " " + std::to_string(place.nStart) + " 0 " +
+           std::to_string(place.cSector) + " fd x\n";
+}
+
+// md2 of sda3, sdb3 (pulled) and sdc3, whose disks have the current layout; the new disk is sdd.
+class RaidReplace : public Raid {
+  protected:
+    RaidReplace()
+    {
+        tree_.Put("/etc.defaults/tavoinfo.conf", "supportraid=yes\n");
+        for (const char *path : {"/dev/sda3", "/dev/sdc3", "/dev/sdd", "/dev/sdd3"})
+            tree_.Put(path, "");
+        tree_.Put("/sys/block/md5/md/dev-sda3/offset", "2048\n");
+        info_.nSlot = 3;
+        info_.pMembers = members_;
+        info_.cbMember = uint64_t{4000000} * 512;
+        SizeOfNew(9437184 + 2048 + 4000000);
+        commands_.OnCommand([this](const std::string &command) { return Answer(command); });
+    }
+
+    void SizeOfNew(uint64_t sectors)
+    {
+        FakeArray sizes(5, 3, {});
+        sizes.cbDevice = sectors * 512;
+        calls_.OnIoctl(sizes);
+    }
+
+    test::CommandReply Answer(const std::string &command) const
+    {
+        for (const char disk : std::string(laid_out_)) {
+            for (int number = 1; number <= 3; ++number) {
+                const TAVOPARTLAYOUT &layout = grgAllTavoPartLayout[9];
+                const TAVOPARTPLACE third = {9437184, 5000000, 0xFD};
+                if (command == "/sbin/sfdisk -l -uS -N" + std::to_string(number) + " /dev/sd" + disk)
+                    return {0, LineOfPartition(number, number == 1   ? layout.place1
+                                                       : number == 2 ? layout.place2
+                                                                     : third)};
+            }
+        }
+        if (command == superblock_)
+            return {0, std::string(test::Capture("mdadm_E_1.2_raid5-mdadm-4.2"))};
+        return {command.find("sfdisk -l") != command.npos || command == fails_, ""};
+    }
+
+    // What was changed; without the looks.
+    std::vector<std::string> Changes()
+    {
+        std::vector<std::string> changes = commands_.Commands();
+        std::erase_if(changes, [](const std::string &command) {
+            return command.find(" -E ") != command.npos || command.find(" -l ") != command.npos;
+        });
+        commands_.Clear();
+        return changes;
+    }
+
+    const char *laid_out_ = "ac";  // the letters of disks with partitions
+    std::string superblock_;
+    std::string fails_;
+    RAIDMEMBER members_[3] = {
+        {"/dev/sda3", 1, &members_[1]}, {"/dev/sdb3", 1, &members_[2]}, {"/dev/sdc3", 1, nullptr}};
+    RAIDINFO info_ = Record(RAID_LEVEL_5);
+};
+
+const std::vector<std::string> kMakeAll = {
+    "/sbin/sfdisk -M1 /dev/sdd > /dev/null 2>&1",
+    "/sbin/sfdisk -N1 -uS -q -f -j256 -z4980480 -tfd -F /dev/sdd > /dev/null 2>&1",
+    "/sbin/sfdisk -N2 -uS -q -f -j0 -z4194304 -tfd -F /dev/sdd > /dev/null 2>&1",
+    "/sbin/sfdisk -N3 -uS -q -f -j262144 -z-1 -tfd -F /dev/sdd >/dev/null 2>&1",
+};
+const std::string kRemoved = "/sbin/mdadm /dev/md5 -r /dev/sdb3 > /dev/null 2>&1";
+const std::string kAdded = "/sbin/mdadm /dev/md5 -a /dev/sdd3 > /dev/null 2>&1";
+
+TEST_F(RaidReplace, PartitionsAndAddsTheNewDisk)
+{
+    std::vector<std::string> all = {kRemoved};
+    all.insert(all.end(), kMakeAll.begin(), kMakeAll.end());
+    all.push_back(kAdded);
+    for (const char *old : {"/dev/sdb3", static_cast<const char *>(nullptr)}) {
+        log_.Clear();
+        EXPECT_EQ(RAIDReplaceDisk(&info_, old, "/dev/sdd"), 0);
+        EXPECT_EQ(Changes(), all);
+        EXPECT_THAT(log_.Texts(),
+                    ElementsAre(MatchesRegex("partition_check_layout:.*"),
+                                MatchesRegex("raid_replace_disk:[0-9]+ \\[Info\\] /dev/sdb3 removed from /dev/md5"),
+                                MatchesRegex("raid_replace_disk:[0-9]+ \\[Info\\] /dev/sdd partitioned as /dev/sda3"),
+                                MatchesRegex("raid_replace_disk:[0-9]+ \\[Info\\] /dev/sdd3 added to /dev/md5")));
+    }
+    // A free slot; the disk has its partitions, and an old superblock in the third.
+    members_[1] = members_[2];
+    laid_out_ = "acd";
+    superblock_ = "/sbin/mdadm -E /dev/sdd3 2>/dev/null";
+    EXPECT_EQ(RAIDReplaceDisk(&info_, nullptr, "/dev/sdd"), 0);
+    EXPECT_THAT(Changes(), ElementsAre("/sbin/mdadm --zero-superblock /dev/sdd3 > /dev/null 2>&1", kAdded));
+}
+
+TEST_F(RaidReplace, AnArrayOfWholeDisks)
+{
+    RAIDMEMBER second = {"/dev/sdb", RAID_MEMBER_FAILED, nullptr};
+    RAIDMEMBER first = {"/dev/sdc", 1, &second};
+    info_.pMembers = &first;
+    info_.nSlot = 2;
+    tree_.Put("/dev/sdc", "");
+    EXPECT_EQ(RAIDReplaceDisk(&info_, nullptr, "/dev/sdd"), 0);
+    EXPECT_THAT(Changes(), ElementsAre("/sbin/mdadm /dev/md5 -r /dev/sdb > /dev/null 2>&1",
+                                       "/sbin/mdadm /dev/md5 -a /dev/sdd > /dev/null 2>&1"));
+}
+
+TEST_F(RaidReplace, RefusesBeforeTheFirstChange)
+{
+    const auto refused = [&](const char *old, const char *log, int code = 0) {
+        log_.Clear();
+        test::ForgetFault();
+        EXPECT_EQ(RAIDReplaceDisk(&info_, old, "/dev/sdd"), -1) << log;
+        EXPECT_EQ(TLIBErrGet(), code);
+        EXPECT_THAT(Changes(), IsEmpty()) << log;
+        ASSERT_FALSE(log_.Texts().empty());
+        EXPECT_THAT(log_.Texts().back(), testing::HasSubstr(log));
+    };
+    refused("/dev/sda3", "/dev/sda3 is in order in /dev/md5");
+    refused("/dev/sde3", "/dev/sde3 is not a member of /dev/md5");
+    SizeOfNew(9437184 + 2048 + 4000000 - 1);
+    refused(nullptr, "'/dev/sdd3' is too small for '/dev/md5'", 0x2900);
+    SizeOfNew(uint64_t{1} << 40);
+    tree_.Put("/sys/class/block/sdd1/holders/md0", "");
+    refused(nullptr, "/dev/sdd1 is in use: md0");
+    tree_.Remove("/sys/class/block");
+    laid_out_ = "c";
+    refused(nullptr, "/dev/sda has no partitions of the system");
+    laid_out_ = "ac";
+    tree_.Remove("/dev/sdc3");
+    refused(nullptr, "lost more than one member");
+    tree_.Remove("/dev/sda3");
+    refused("/dev/sdb3", "has no member that is in order");
+    for (const char *path : {"/dev/sda3", "/dev/sdb3", "/dev/sdc3"})
+        tree_.Put(path, "");
+    refused(nullptr, "no failed or pulled member, and no free slot");
+    for (const char *disk : {"/dev/sdd3", "sdd", "/dev/sd d", ""})
+        EXPECT_EQ(RAIDReplaceDisk(&info_, nullptr, disk), -1) << disk;
+    info_.fLevel = RAID_LEVEL_0;
+    refused(nullptr, "Bad parameters", 0x0D00);
+}
+
+TEST_F(RaidReplace, StopsAtTheFirstFailure)
+{
+    fails_ = kMakeAll[1];
+    EXPECT_EQ(RAIDReplaceDisk(&info_, nullptr, "/dev/sdd"), -1);
+    EXPECT_EQ(Changes().size(), 3u);
+    fails_ = kRemoved;
+    tree_.Put("/sys/block/md5/md/dev-sdb3/state", "faulty\n");
+    EXPECT_EQ(RAIDReplaceDisk(&info_, nullptr, "/dev/sdd"), -1) << "md does not let go of it";
+    EXPECT_THAT(Changes(), testing::Not(Contains(kMakeAll[0])));
+    tree_.Remove("/sys/block/md5/md/dev-sdb3");
+    fails_ = kAdded;
+    EXPECT_EQ(RAIDReplaceDisk(&info_, nullptr, "/dev/sdd"), -1);
+    EXPECT_EQ(TLIBErrGet(), 0x8100);
 }
 
 TEST_F(Raid, RemoveStopsAndCleans)
