@@ -21,7 +21,7 @@ std::string Because(const char *what)
 
 }  // namespace
 
-BlockTarget::BlockTarget(const std::string &path, OpenMode mode) : path_(path)
+BlockTarget::BlockTarget(const std::string &path, OpenMode mode) : path_(path), read_only_(mode == OpenMode::read)
 {
     // Without waiting: a FIFO in the place of a disk has no other end.
     const int access = mode == OpenMode::read ? O_RDONLY : O_RDWR;
@@ -79,6 +79,11 @@ void BlockTarget::Write(uint64_t number, const Sector &sector)
     } while (written < 0 && errno == EINTR);
     if (written != ssize_t{kSectorBytes})
         throw Failure(written < 0 ? Because("cannot write") : "took only a part of a sector");
+    Sync();
+}
+
+void BlockTarget::Sync()
+{
     if (::fsync(fd_) != 0)
         throw Failure(Because("cannot sync"));
 }

@@ -31,11 +31,16 @@ class BlockTarget {
 
     const std::string &Path() const { return path_; }
     uint64_t Sectors() const { return sectors_; }
+    int Descriptor() const { return fd_; }
+    bool IsReadOnly() const { return read_only_; }
 
     Sector Read(uint64_t number) const;
 
     // In one write, and on the disk when it returns.
     void Write(uint64_t number, const Sector &sector);
+
+    // What was written through the descriptor is on the disk when it returns.
+    void Sync();
 
     // Lets the kernel read the table again. While partitions of the disk are in use it refuses that; then it is told of
     // partition `changed` alone (0: of none). An image file has no partitions.
@@ -47,6 +52,7 @@ class BlockTarget {
     std::string path_;
     int fd_ = -1;
     bool is_disk_ = false;
+    bool read_only_ = false;
     uint64_t sectors_ = 0;
 };
 

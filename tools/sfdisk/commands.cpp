@@ -1,6 +1,7 @@
 // What the program does: list, create, empty one entry, write an empty table.
 #include "commands.h"
 
+#include "guid_table.h"
 #include "partition_table.h"
 
 #include <cinttypes>
@@ -9,7 +10,6 @@
 namespace sfdisk {
 namespace {
 
-constexpr uint8_t kGuidTable = 0xEE;
 constexpr int kLastPrimary = 4;
 
 struct TypeName {
@@ -59,8 +59,72 @@ std::string DeviceOf(const std::string &disk, int number)
 void PrintLine(const std::string &disk, const Partition &partition)
 {
     const TableEntry &entry = partition.entry;
-    std::printf("%s %" PRIu32 " %" PRIu64 " %" PRIu32 " %x %s\n", DeviceOf(disk, partition.number).c_str(), entry.start,
+    std::printf("%s %" PRIu64 " %" PRIu64 " %" PRIu64 " %x %s\n", DeviceOf(disk, partition.number).c_str(), entry.start,
                 entry.End() - 1, entry.count, unsigned{entry.type}, NameOf(entry.type));
+}
+
+// The partitions of a table of either kind. A damaged GUID table is what its protective entry says.
+std::vector<Partition> ReadAny(const BlockTarget &disk)
+{
+    if (HasGuidTable(disk)) {
+        try {
+            return GuidTable(disk).Partitions();
+        } catch (const Failure &) {
+        }
+    }
+    return ReadPartitions(disk);
+}
+
+Wish WishOf(const Options &options)
+{
+    return {options.number, options.start, options.gap.value_or(0), options.count, options.type};
+}
+
+TableEntry CreateEntry(BlockTarget &disk, const Options &options)
+{
+    const std::vector<Partition> partitions = ReadPartitions(disk);
+    const TableEntry entry = PlacePartition(partitions, RoomOf(disk.Sectors()), WishOf(options));
+    if (!options.quiet && !options.count && entry.End() < disk.Sectors())
+        std::fprintf(stderr, "sfdisk: %s: the sectors from 2^32 on stay unused (-M1 makes a table for them)\n",
+                     options.path.c_str());
+    Sector sector = disk.Read(0);
+    WriteEntry(sector, static_cast<size_t>(options.number) - 1, entry);
+    disk.Write(0, sector);
+    return entry;
+}
+
+TableEntry CreateGuidEntry(BlockTarget &disk, const Options &options)
+{
+    GuidTable table(disk);
+    const TableEntry entry = PlacePartition(table.Partitions(), table.Usable(), WishOf(options));
+    table.Put(options.number, entry);
+    table.Write();
+    disk.Sync();
+    return entry;
+}
+
+void ClearEntry(BlockTarget &disk, const Partition &partition)
+{
+    Sector sector = disk.Read(partition.sector);
+    WriteEntry(sector, partition.slot, TableEntry{});
+    disk.Write(partition.sector, sector);
+}
+
+void ClearGuidEntry(BlockTarget &disk, const Partition &partition)
+{
+    GuidTable table(disk);
+    table.Remove(partition.number);
+    table.Write();
+    disk.Sync();
+}
+
+// A GUID table whose first copy is gone would come back from the one at the end.
+void EraseGuidHeaders(BlockTarget &disk)
+{
+    for (const uint64_t number : {uint64_t{1}, disk.Sectors() - 1}) {
+        if (number < disk.Sectors() && number > 0 && IsGuidHeader(disk.Read(number)))
+            disk.Write(number, Sector{});
+    }
 }
 
 }  // namespace
@@ -72,7 +136,7 @@ int RunList(const Options &options)
     if (options.number && !HasSignature(disk.Read(0)))
         return 1;
     bool any = options.number == 0;
-    for (const Partition &partition : ReadPartitions(disk)) {
+    for (const Partition &partition : ReadAny(disk)) {
         if (options.number && partition.number != options.number)
             continue;
         PrintLine(disk.Path(), partition);
@@ -88,18 +152,7 @@ int RunCreate(const Options &options)
     if (TableEntry{.type = options.type}.IsExtended())
         throw Failure("extended partitions cannot be created");
     BlockTarget disk(options.path, ModeOf(options));
-    const std::vector<Partition> partitions = ReadPartitions(disk);
-    for (const Partition &partition : partitions) {
-        if (partition.entry.type == kGuidTable)
-            throw Failure("has a GUID partition table (-M1 replaces it)");
-    }
-    const Wish wish = {options.number, options.start, options.gap.value_or(0), options.count, options.type};
-    const TableEntry entry = PlacePartition(partitions, disk.Sectors(), wish);
-    if (!options.quiet && !options.count && entry.End() < disk.Sectors())
-        std::fprintf(stderr, "sfdisk: %s: the sectors from 2^32 on stay unused\n", options.path.c_str());
-    Sector sector = disk.Read(0);
-    WriteEntry(sector, static_cast<size_t>(options.number) - 1, entry);
-    disk.Write(0, sector);
+    const TableEntry entry = HasGuidTable(disk) ? CreateGuidEntry(disk, options) : CreateEntry(disk, options);
     if (options.reread)
         disk.RereadTable(options.number, entry);
     return 0;
@@ -108,16 +161,18 @@ int RunCreate(const Options &options)
 int RunClear(const Options &options)
 {
     BlockTarget disk(options.path, ModeOf(options));
-    const std::vector<Partition> partitions = ReadPartitions(disk);
-    const std::optional<Partition> partition = FindPartition(partitions, options.number);
+    const bool guid = HasGuidTable(disk);
+    const std::optional<Partition> partition =
+        FindPartition(guid ? GuidTable(disk).Partitions() : ReadPartitions(disk), options.number);
     if (!partition) {
         if (options.number <= kLastPrimary)
             return 0;
         throw Failure("has no partition " + std::to_string(options.number));
     }
-    Sector sector = disk.Read(partition->sector);
-    WriteEntry(sector, partition->slot, TableEntry{});
-    disk.Write(partition->sector, sector);
+    if (guid)
+        ClearGuidEntry(disk, *partition);
+    else
+        ClearEntry(disk, *partition);
     if (options.reread)
         disk.RereadTable(options.number, TableEntry{});
     return 0;
@@ -126,10 +181,16 @@ int RunClear(const Options &options)
 int RunLabel(const Options &options)
 {
     BlockTarget disk(options.path, ModeOf(options));
-    // All of the sector: what is left of a file system's first sector would make the disk look like one.
-    Sector sector = {};
-    SetSignature(sector);
-    disk.Write(0, sector);
+    if (NeedsGuidTable(disk)) {
+        GuidTable::Create(disk);
+        disk.Sync();
+    } else {
+        EraseGuidHeaders(disk);
+        // All of the sector: what is left of a file system's first sector would make the disk look like one.
+        Sector sector = {};
+        SetSignature(sector);
+        disk.Write(0, sector);
+    }
     if (options.reread)
         disk.RereadTable(0, TableEntry{});
     return 0;

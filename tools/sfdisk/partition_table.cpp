@@ -30,9 +30,9 @@ void ReadLogical(const BlockTarget &disk, const TableEntry &extended, std::vecto
             if (entry.IsEmpty())
                 continue;
             if (entry.IsExtended()) {
-                next = uint64_t{extended.start} + entry.start;
+                next = extended.start + entry.start;
             } else if (at + entry.End() <= end && number <= kLastLogical) {
-                entry.start = static_cast<uint32_t>(at + entry.start);
+                entry.start += at;
                 partitions.push_back({number++, entry, at, slot});
             }
         }
@@ -73,31 +73,39 @@ std::optional<Partition> FindPartition(const std::vector<Partition> &partitions,
     return found == partitions.end() ? std::nullopt : std::optional(*found);
 }
 
-TableEntry PlacePartition(const std::vector<Partition> &partitions, uint64_t disk_sectors, const Wish &wish)
+Room RoomOf(uint64_t disk_sectors)
 {
+    return {.first = 1,
+            .end = std::min(disk_sectors, kAddressableSectors),
+            .has_logical = true,
+            .end_name = "of the disk or of sector 2^32"};
+}
+
+TableEntry PlacePartition(const std::vector<Partition> &partitions, const Room &room, const Wish &wish)
+{
+    const auto counts = [&](const Partition &other) {
+        return !room.has_logical || other.number < kFirstLogical;
+    };
     uint64_t before = 0;
     for (const Partition &partition : partitions) {
-        if (partition.number < wish.number && partition.number < kFirstLogical)
+        if (partition.number < wish.number && counts(partition))
             before = partition.entry.End();
     }
-    const uint64_t limit = std::min(disk_sectors, kAddressableSectors);
     const uint64_t offset = wish.start.value_or(wish.gap);
-    if (offset >= limit)
-        throw Failure(PartitionName(wish.number) + " would start beyond the end of the disk or of sector 2^32");
     const uint64_t start = wish.start ? offset : before + offset;
-    if (start == 0)
+    if (offset >= room.end || start >= room.end)
+        throw Failure(PartitionName(wish.number) + " would start beyond the end " + room.end_name);
+    if (start < room.first)
         throw Failure(PartitionName(wish.number) + " would cover the partition table");
-    if (start >= limit)
-        throw Failure(PartitionName(wish.number) + " would start beyond the end of the disk or of sector 2^32");
-    const uint64_t count = wish.count.value_or(limit - start);
-    if (count > limit - start)
-        throw Failure(PartitionName(wish.number) + " would reach beyond the end of the disk or of sector 2^32");
+    const uint64_t count = wish.count.value_or(room.end - start);
+    if (count > room.end - start)
+        throw Failure(PartitionName(wish.number) + " would reach beyond the end " + room.end_name);
     for (const Partition &other : partitions) {
         const bool apart = other.entry.End() <= start || start + count <= other.entry.start;
-        if (other.number != wish.number && other.number < kFirstLogical && !apart)
+        if (other.number != wish.number && counts(other) && !apart)
             throw Failure(PartitionName(wish.number) + " would overlap " + PartitionName(other.number));
     }
-    return {.boot = 0, .type = wish.type, .start = static_cast<uint32_t>(start), .count = static_cast<uint32_t>(count)};
+    return {.boot = 0, .type = wish.type, .start = start, .count = count};
 }
 
 }  // namespace sfdisk

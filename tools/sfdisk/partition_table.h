@@ -32,9 +32,20 @@ struct Wish {
     uint8_t type;
 };
 
+// Where partitions can be.
+struct Room {
+    uint64_t first;
+    uint64_t end;      // the first sector beyond
+    bool has_logical;  // partitions from 5 on are within another one
+    const char *end_name;
+};
+
+// That of an MS-DOS table.
+Room RoomOf(uint64_t disk_sectors);
+
 // The entry that the wish makes. Throws Failure when it does not fit: beyond the disk or what a table can address, onto
 // the table itself, or onto another partition.
-TableEntry PlacePartition(const std::vector<Partition> &partitions, uint64_t disk_sectors, const Wish &wish);
+TableEntry PlacePartition(const std::vector<Partition> &partitions, const Room &room, const Wish &wish);
 
 }  // namespace sfdisk
 

@@ -13,7 +13,7 @@ uint32_t Load32(const uint8_t *at)
     return uint32_t{at[0]} | uint32_t{at[1]} << 8 | uint32_t{at[2]} << 16 | uint32_t{at[3]} << 24;
 }
 
-void Store32(uint8_t *at, uint32_t value)
+void Store32(uint8_t *at, uint64_t value)
 {
     for (int i = 0; i < 4; ++i)
         at[i] = static_cast<uint8_t>(value >> 8 * i);

@@ -17,12 +17,12 @@ using Sector = std::array<uint8_t, kSectorBytes>;
 struct TableEntry {
     uint8_t boot = 0;
     uint8_t type = 0;
-    uint32_t start = 0;  // sectors, from what the table that holds the entry counts from
-    uint32_t count = 0;
+    uint64_t start = 0;  // sectors, from what the table that holds the entry counts from; an MS-DOS one has 32 bits
+    uint64_t count = 0;
 
     bool IsEmpty() const { return count == 0; }
     bool IsExtended() const { return type == 0x05 || type == 0x0F || type == 0x85; }
-    uint64_t End() const { return uint64_t{start} + count; }
+    uint64_t End() const { return start + count; }
 };
 
 // Whether the sector carries the signature of a table.

@@ -170,13 +170,138 @@ TEST_F(Sfdisk, RefusesWhatDoesNotFit)
 TEST_F(Sfdisk, TheRestOfALargeDiskEndsWhereNumbersEnd)
 {
     Resize(4096 * kGiB);
-    ASSERT_EQ(Run({"-M1"}).status, 0);
+    PutSector(0, Table({}));  // its kind stays
     const test::Ran loud = Run({"-N1", "-j256", "-z-1", "-t83"});
     EXPECT_EQ(loud.status, 0);
     EXPECT_THAT(loud.err, testing::HasSubstr("2^32"));
     EXPECT_EQ(List(), "1 256 4294967295 4294967040 83 Linux\n");
     EXPECT_EQ(Sector().substr(451, 3), "\xFE\xFF\xFF");
     EXPECT_EQ(Run({"-N1", "-j256", "-z-1", "-t83", "-q"}).err, "");
+}
+
+constexpr uint64_t kSectorsOf3Tb = 5860533168;
+
+// Whatever other people use finds nothing to complain about.
+void ExpectSound(const std::string &image)
+{
+    const std::vector<std::string> checks[] = {
+        {"/usr/lib/peers/sfdisk", "--verify", image},
+        {"/usr/lib/peers/sgdisk", "--verify", image},
+        {"/usr/lib/peers/parted", "--script", image, "unit", "s", "print"},
+    };
+    for (const std::vector<std::string> &check : checks) {
+        if (::access(check[0].c_str(), X_OK) != 0)
+            continue;  // the virtual appliance has none of them
+        const test::Ran ran = test::RunningProgram(check[0], {check.begin() + 1, check.end()}).Wait();
+        EXPECT_EQ(ran.status, 0) << check[0] << ran.out << ran.err;
+        if (check[0].ends_with("sgdisk")) {
+            EXPECT_THAT(ran.out, testing::HasSubstr("No problems found")) << ran.out;
+        }
+    }
+}
+
+TEST_F(Sfdisk, GivesLargeDisksAGuidTable)
+{
+    const struct {
+        uint64_t sectors;
+        const char *start, *gap;
+        const char *first;  // lines
+    } rows[] = {
+        {(uint64_t{1} << 32) + 1, "-j256", "-j262144", "1 256 4980735 4980480 fd Linux raid autodetect\n"},
+        {kSectorsOf3Tb, "-j256", "-j262144", "1 256 4980735 4980480 fd Linux raid autodetect\n"},
+        {kSectorsOf3Tb, "-j63", "-j262144", "1 63 4980542 4980480 fd Linux raid autodetect\n"},
+        {uint64_t{8} << 31, "-j256", "-j262144", "1 256 4980735 4980480 fd Linux raid autodetect\n"},
+        {uint64_t{40} << 31, "-j256", "-j16002", "1 256 4980735 4980480 fd Linux raid autodetect\n"},
+    };
+    for (const auto &row : rows) {
+        if (::truncate(image_.c_str(), 0) != 0 ||
+            ::truncate(image_.c_str(), static_cast<off_t>(row.sectors * 512)) != 0)
+            continue;  // the file system, or a 32-bit kernel, ends before
+        PutSector(0, std::string(512, 'x'));
+        EXPECT_EQ(Run({"-M1"}).status, 0);
+        EXPECT_EQ(Run({"-l"}).out, "");
+        EXPECT_EQ(Run({"-N1", "-uS", "-q", "-f", row.start, "-z4980480", "-tfd", "-F"}).status, 0);
+        EXPECT_EQ(Run({"-N2", "-uS", "-q", "-f", "-j0", "-z4194304", "-t82", "-F"}).status, 0);
+        const test::Ran last = Run({"-N3", "-uS", "-q", "-f", row.gap, "-z-1", "-t83", "-F"});
+        EXPECT_EQ(last.status, 0);
+        EXPECT_EQ(last.out + last.err, "");
+        const uint64_t start = std::stoull(row.start + 2) + 4980480 + 4194304 + std::stoull(row.gap + 2);
+        const uint64_t end = row.sectors - 34;  // the copy of the table
+        EXPECT_EQ(List({"-l", "-N1"}), row.first);
+        EXPECT_EQ(List({"-l", "-uS", "-N3"}), "3 " + std::to_string(start) + " " + std::to_string(end) + " " +
+                                                  std::to_string(end - start + 1) + " 83 Linux\n");
+        EXPECT_THAT(List({"-l", "-uS", "-N2"}), testing::EndsWith(" 4194304 82 Linux swap\n"));
+        EXPECT_EQ(Sector().substr(446 + 4, 1), "\xEE") << "the protective table";
+        ExpectSound(image_);
+        EXPECT_EQ(Run({"-N3", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0);
+        EXPECT_EQ(Run({"-N3", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0) << "empty";
+        EXPECT_EQ(Run({"-N15", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 1);
+        EXPECT_EQ(List({"-l", "-N3"}), "");
+        ExpectSound(image_);
+    }
+}
+
+TEST_F(Sfdisk, RefusesWhatDoesNotFitAGuidTable)
+{
+    Resize(static_cast<off_t>(kSectorsOf3Tb * 512));
+    ASSERT_EQ(Run({"-M1"}).status, 0);
+    ASSERT_EQ(Run({"-N3", "-o100", "-z8", "-t83"}).status, 0);
+    const struct {
+        std::vector<std::string> words;
+        const char *complaint;
+    } rows[] = {
+        {{"-N1", "-j33", "-z10", "-t83"}, "cover the partition table"},
+        {{"-N1", "-j5860533135", "-z-1", "-t83"}, "start beyond"},
+        {{"-N1", "-j5860533134", "-z2", "-t83"}, "reach beyond"},
+        {{"-N1", "-j200", "-z18446744073709551615", "-t83"}, "reach beyond"},
+        {{"-N4", "-o107", "-z10", "-t83"}, "overlap partition 3"},
+        {{"-N5", "-j1", "-z1", "-t83"}, "only partitions 1 to 4"},
+        {{"-N1", "-j200", "-z1", "-tf"}, "extended partitions"},
+        {{"-N1", "-j200", "-z1", "-t8e"}, "types fd, 82 and 83"},
+    };
+    const std::string before = Sector(1) + Sector(2);
+    for (const auto &row : rows) {
+        const test::Ran result = Run(row.words);
+        EXPECT_EQ(result.status, 1) << row.complaint;
+        EXPECT_THAT(result.err, testing::HasSubstr(row.complaint));
+        EXPECT_EQ(Sector(1) + Sector(2), before);
+    }
+    EXPECT_EQ(Run({"-N4", "-o108", "-z10", "-tfd"}).status, 0);
+    EXPECT_EQ(Run({"-N3", "-o34", "-z8", "-tfd"}).status, 0) << "in its own place";
+    EXPECT_EQ(List(), "3 34 41 8 fd Linux raid autodetect\n4 108 117 10 fd Linux raid autodetect\n");
+
+    // The first copy is damaged: the second one is read, and both are whole after the next change.
+    PutSector(1, std::string(512, 'r'));
+    EXPECT_EQ(List({"-l", "-N4"}), "4 108 117 10 fd Linux raid autodetect\n");
+    EXPECT_EQ(Run({"-N3", "-q", "-f", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0);
+    ExpectSound(image_);
+    // Both: nothing is changed, and an empty table makes the disk usable.
+    PutSector(1, std::string(512, 'r'));
+    PutSector(static_cast<off_t>(kSectorsOf3Tb) - 1, std::string(512, 'r'));
+    EXPECT_THAT(Run({"-N1", "-j200", "-z1", "-t83"}).err, testing::HasSubstr("damaged GUID"));
+    EXPECT_EQ(List({"-l", "-N4"}), "");
+    EXPECT_EQ(Run({"-M1"}).status, 0);
+    ExpectSound(image_);
+}
+
+TEST_F(Sfdisk, ChangesTheKindOfTableForAnEmptyOneAlone)
+{
+    // A GUID table on a small disk, from the time when it was in another box.
+    const std::string peer = "/usr/lib/peers/sgdisk";
+    if (::access(peer.c_str(), X_OK) != 0)
+        GTEST_SKIP() << "needs another tool that writes such tables";
+    ASSERT_EQ(test::RunningProgram(peer, {"--clear", "--new=2:4096:8191", "--typecode=2:ef00", image_}).Wait().status,
+              0);
+    EXPECT_EQ(List(), "2 4096 8191 4096 ef Unknown\n");
+    EXPECT_EQ(Run({"-N1", "-o2048", "-z1024", "-t83"}).status, 0);
+    EXPECT_EQ(List({"-l", "-N1"}), "1 2048 3071 1024 83 Linux\n");
+    ExpectSound(image_);
+    ASSERT_EQ(Run({"-M1"}).status, 0);
+    EXPECT_EQ(Sector(0), Table({}));
+    EXPECT_EQ(Sector(1), std::string(512, '\0')) << "or it would come back";
+    EXPECT_EQ(Sector(8 * kGiB / 512 - 1), std::string(512, '\0'));
+    const test::Ran other = test::RunningProgram("/usr/lib/peers/sfdisk", {"--dump", image_}).Wait();
+    EXPECT_THAT(other.out, testing::HasSubstr("label: dos"));
 }
 
 TEST_F(Sfdisk, RefusesWhatItDoesNotKnow)
