@@ -1,7 +1,7 @@
 """The virtual appliance: a 32-bit ARM machine in an emulator, started or woken from a saved state.
 
-Nothing of a running machine lies in the file system: its disks are unlinked files, its lines to the host inherited
-sockets, and the emulator dies with the process that started it.
+Nothing of a running machine is in the file system: its disks are unlinked files (unless they are named, and kept), its
+lines to the host inherited sockets, and the emulator dies with the process that started it.
 """
 import dataclasses
 import fcntl
@@ -48,6 +48,37 @@ class Hardware:
         if self.bus not in ('sata', 'scsi') or not 0 <= self.disks <= most or self.size < 1 or self.memory < 256:
             raise ValueError(f'no such machine: {self.disks} disks of {self.size} MiB on {self.bus} '
                              f'({most} disks at most), {self.memory} MiB of memory (256 at least)')
+
+
+@dataclasses.dataclass(frozen=True)
+class KeptDisk:
+    path: str
+    size: int  # bytes; 0: what the file has
+
+    @classmethod
+    def parse(cls, text):
+        """FILE[:SIZE], the size in MiB or with G or T."""
+        match = re.fullmatch(r'(.+?)(?::([0-9]+)([GT]?))?', text)
+        if not match:
+            raise ValueError(f'no such disk: {text}')
+        unit = {'': 20, 'G': 30, 'T': 40}[match[3] or '']
+        return cls(match[1], int(match[2] or 0) << unit)
+
+    def open(self):
+        """The open file, of the size that was asked for, for one machine at a time."""
+        if not self.size and not os.path.exists(self.path):
+            raise ValueError(f'a new disk needs a size: {self.path}:SIZE')
+        disk = os.fdopen(os.open(self.path, os.O_RDWR | os.O_CREAT | os.O_CLOEXEC, 0o644), 'r+b')
+        try:
+            fcntl.flock(disk, fcntl.LOCK_EX | fcntl.LOCK_NB)
+        except BlockingIOError:
+            raise ValueError(f'another machine has the disk {self.path}') from None
+        there = os.fstat(disk.fileno()).st_size
+        if self.size and there not in (0, self.size):
+            raise ValueError(f'the disk {self.path} has {there >> 20} MiB already')
+        if not there:
+            disk.truncate(self.size)
+        return disk
 
 
 @dataclasses.dataclass
@@ -104,15 +135,17 @@ class _Monitor:
 class Machine:
     """with Machine(...) as machine: outcome = machine.run([...])"""
 
-    def __init__(self, image, hardware=Hardware(), share=None, cold=False, deadline=None):
+    def __init__(self, image, hardware=Hardware(), share=None, cold=False, deadline=None, kept=()):
         self.image, self.hardware, self.deadline = image, hardware, deadline
         self.share = os.path.realpath(share) if share else None
-        self.cold = cold
+        self.kept = list(kept)
+        self.cold = cold or bool(self.kept)  # a saved machine remembers what was on its disks
         self.console = b''
         self.console_to = None  # where an interactive console goes
         self.tick = None
         self.process = None
         self.lines = {}
+        self.disks = []
 
     def __enter__(self):
         try:
@@ -140,6 +173,7 @@ class Machine:
         for line in self.lines.values():
             line.close()
         self.lines = {}
+        self.disks = []
 
     # Starting
 
@@ -187,8 +221,11 @@ class Machine:
                         f'mac=52:54:00:00:00:0{card + 1}']
         self.disks = []
         for bay in range(1, hardware.disks + 1):
-            disk = tempfile.TemporaryFile(prefix='tavo-disk.')
-            disk.truncate(hardware.size << 20)
+            if self.kept:
+                disk = self.kept[bay - 1].open()
+            else:
+                disk = tempfile.TemporaryFile(prefix='tavo-disk.')
+                disk.truncate(hardware.size << 20)
             self.disks.append(disk)
             inherited.append(disk.fileno())
             command += ['-add-fd', f'fd={disk.fileno()},set={bay}', '-blockdev',
