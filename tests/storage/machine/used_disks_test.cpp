@@ -1,0 +1,232 @@
+// Real disks that had a life: a volume was on them, they were pulled, they are large, they are somebody else's.
+#include "real_storage.h"
+
+#include <gmock/gmock.h>
+
+namespace {
+
+using test::BecomesNormal;
+using test::Make;
+using test::MembersOf;
+using test::ReadArray;
+using test::Shell;
+using test::StatusOf;
+using test::Told;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::UnorderedElementsAre;
+
+using MachineUsedDisks = test::StorageTest;
+
+void Partition(int bay)
+{
+    const std::string disk = test::Disk(bay);
+    ASSERT_EQ(PartitionCreate(disk.c_str(), PARTITION_SYSTEM, nullptr), 0) << disk;
+    ASSERT_EQ(PartitionCreate(disk.c_str(), PARTITION_DATA, nullptr), 0) << disk;
+}
+
+void MakeVolume()
+{
+    ASSERT_EQ(LVMCreate(test::MakeList({"/dev/md2"}).get(), "/dev/vg1", "lv", nullptr, 0), 0);
+    Told("mkfs.ext4 -q -F /dev/vg1/lv && mount /dev/vg1/lv /mnt && dd if=/dev/urandom of=/mnt/data bs=64k count=64 && "
+         "sync");
+}
+
+void DropVolume()
+{
+    Told("umount /mnt");
+    EXPECT_EQ(LVMRemove("/dev/vg1", "lv"), 0);
+    EXPECT_EQ(LVMVgRemove("/dev/vg1"), 0);
+    EXPECT_EQ(LVMPvRemove("/dev/md2"), 0);
+}
+
+TEST_F(MachineUsedDisks, AVolumeIsMadeWhereOneWasBefore)
+{
+    const std::vector<std::string> members = {"/dev/sda", "/dev/sdb", "/dev/sdc"};
+    ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_5, .members = members, .sync = false}), 0);
+    MakeVolume();
+    DropVolume();
+    MakeVolume();
+    DropVolume();
+    // And through an array that was made again.
+    ASSERT_EQ(RAIDRemove(ReadArray("/dev/md2").get()), 0);
+    ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_5, .members = members, .sync = false}), 0);
+    MakeVolume();
+}
+
+TEST_F(MachineUsedDisks, ADiskInUseIsNotHalfCleaned)
+{
+    test::PlugLargeDisks(2, 4800);
+    Partition(1);
+    Partition(2);
+    ASSERT_EQ(Make({.path = "/dev/md0",
+                    .level = RAID_LEVEL_1,
+                    .members = {"/dev/sda1", "/dev/sdb1"},
+                    .mib = 64,
+                    .sync = false}),
+              0);
+    const std::string table = Told("head -c 512 /dev/sda | sha256sum; ls /sys/block/sda | grep sda");
+    EXPECT_EQ(PartitionClean("/dev/sda", PARTITION_SYSTEM), -1);
+    EXPECT_EQ(PartitionCreate("/dev/sda", PARTITION_SYSTEM, nullptr), -1);
+    EXPECT_EQ(Told("head -c 512 /dev/sda | sha256sum; ls /sys/block/sda | grep sda"), table);
+    EXPECT_EQ(StatusOf("/dev/md0"), RAID_STATUS_NORMAL);
+    // The system's array does not hinder the data partition; a file system on it does.
+    Told("mkfs.ext4 -q -F /dev/sda3 && mount /dev/sda3 /mnt");
+    EXPECT_EQ(PartitionClean("/dev/sda", PARTITION_DATA), -1);
+    EXPECT_EQ(Told("head -c 512 /dev/sda | sha256sum; ls /sys/block/sda | grep sda"), table);
+    Told("umount /mnt");
+    EXPECT_EQ(PartitionClean("/dev/sda", PARTITION_DATA), 0);
+    EXPECT_EQ(PartitionCreate("/dev/sda", PARTITION_DATA, nullptr), 0);
+    EXPECT_EQ(StatusOf("/dev/md0"), RAID_STATUS_NORMAL);
+}
+
+TEST_F(MachineUsedDisks, NoOldArrayComesBackAfterCleaning)
+{
+    test::PlugLargeDisks(2, 4800);
+    for (const int bay : {1, 2})
+        Partition(bay);
+    for (const int number : {1, 2, 3}) {
+        const std::string tail = std::to_string(number);
+        ASSERT_EQ(Make({.path = "/dev/md" + std::to_string(number - 1),
+                        .level = RAID_LEVEL_1,
+                        .members = {"/dev/sda" + tail, "/dev/sdb" + tail},
+                        .mib = 16,
+                        .sync = false}),
+                  0);
+    }
+    for (const char *array : {"/dev/md0", "/dev/md1", "/dev/md2"})
+        ASSERT_EQ(RAIDStop(array), 0);
+    for (const int bay : {1, 2}) {
+        EXPECT_EQ(PartitionClean(test::Disk(bay).c_str(), PARTITION_SYSTEM | PARTITION_DATA), 0);
+        Partition(bay);
+    }
+    Shell("mdadm -A --scan");
+    EXPECT_THAT(Told("cat /proc/mdstat"), testing::Not(HasSubstr("raid1")));
+    for (const char *member : {"/dev/sda1", "/dev/sda2", "/dev/sda3", "/dev/sdb2"}) {
+        RAIDSUPERBLOCK superblock;
+        EXPECT_EQ(RAIDSBGet(member, &superblock), 0) << member;
+    }
+}
+
+TEST_F(MachineUsedDisks, APulledDiskIsReplacedInItsBay)
+{
+    test::PlugLargeDisks(4, 4800);
+    for (const int bay : {1, 2, 3, 4})
+        Partition(bay);
+    ASSERT_EQ(Make({.path = "/dev/md0",
+                    .level = RAID_LEVEL_1,
+                    .members = {"/dev/sda1", "/dev/sdb1", "/dev/sdc1", "/dev/sdd1"},
+                    .mib = 32,
+                    .sync = false}),
+              0);
+    ASSERT_EQ(Make({.path = "/dev/md2",
+                    .level = RAID_LEVEL_5,
+                    .members = {"/dev/sda3", "/dev/sdb3", "/dev/sdc3", "/dev/sdd3"},
+                    .mib = 64,
+                    .sync = false}),
+              0);
+    MakeVolume();
+    const std::string sum = Told("sha256sum /mnt/data");
+
+    test::Happen("pull 4");
+    Told("dd if=/dev/urandom of=/mnt/more bs=64k count=16 && sync");
+    ASSERT_TRUE(test::Eventually([] { return StatusOf("/dev/md2") == RAID_STATUS_DEGRADED; }));
+    EXPECT_THAT(MembersOf("/dev/md2", RAID_MEMBER_FAILED), ElementsAre("/dev/sdd3"));
+    uint64_t kib = 0;
+    EXPECT_GE(RAIDExpansible(ReadArray("/dev/md2").get(), &kib), 0);
+
+    // The arrays hold the disk's name until it is removed: of md0, which has not noticed, too.
+    EXPECT_EQ(RAIDRemoveDisk(ReadArray("/dev/md2").get(), "/dev/sdd3"), 0);
+    EXPECT_EQ(RAIDRemoveDisk(ReadArray("/dev/md0").get(), "/dev/sdd1"), 0);
+    EXPECT_EQ(ReadArray("/dev/md0")->nWorking, 3);
+
+    // Too small: refused, nothing changed. Then a good one.
+    test::Happen("plug 4 --blank 4700");
+    ASSERT_TRUE(test::Eventually([] { return DiskIsExist("/dev/sdd") == 1; })) << "the bay has its name again";
+    EXPECT_EQ(RAIDReplaceDisk(ReadArray("/dev/md2").get(), nullptr, "/dev/sdd"), 0) << "64 MiB of each are used";
+    EXPECT_EQ(RAIDReplaceDisk(ReadArray("/dev/md0").get(), nullptr, "/dev/sdd"), 0);
+    EXPECT_TRUE(BecomesNormal("/dev/md2"));
+    EXPECT_TRUE(BecomesNormal("/dev/md0"));
+    EXPECT_THAT(MembersOf("/dev/md2", RAID_MEMBER_ACTIVE),
+                UnorderedElementsAre("/dev/sda3", "/dev/sdb3", "/dev/sdc3", "/dev/sdd3"));
+    Told("echo 3 >/proc/sys/vm/drop_caches");
+    EXPECT_EQ(Told("sha256sum /mnt/data"), sum);
+}
+
+TEST_F(MachineUsedDisks, AReplacementThatIsTooSmallChangesNothing)
+{
+    ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .sync = false}), 0);
+    test::Happen("pull 2");
+    test::Happen("plug 2 --blank 90");
+    const std::string disk = Told("ls /dev/sd? | grep -v '/dev/sd[acdef]'");
+    const std::string before = Told("cat /proc/mdstat");
+    EXPECT_EQ(RAIDReplaceDisk(ReadArray("/dev/md2").get(), "/dev/sdb", disk.substr(0, disk.size() - 1).c_str()), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_NOT_ENOUGH_SPACE);
+    EXPECT_EQ(Told("cat /proc/mdstat"), before);
+}
+
+TEST_F(MachineUsedDisks, AnArrayStartsWithoutAMemberThatIsGone)
+{
+    const std::vector<std::string> members = {"/dev/sda", "/dev/sdb", "/dev/sdc", "/dev/sdd"};
+    ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_5, .members = members, .sync = false}), 0);
+    const test::Array record = ReadArray("/dev/md2");
+    ASSERT_EQ(RAIDStop("/dev/md2"), 0);
+    ASSERT_EQ(RAIDAssembleByInfo(record.get()), 0);
+    EXPECT_EQ(StatusOf("/dev/md2"), RAID_STATUS_NORMAL);
+    ASSERT_EQ(RAIDStop("/dev/md2"), 0);
+    test::Happen("pull 3");
+    EXPECT_EQ(RAIDAssembleByInfo(record.get()), 0);
+    EXPECT_EQ(StatusOf("/dev/md2"), RAID_STATUS_DEGRADED);
+    // Its record has three members now, and mdadm asks for a fourth.
+    const test::Array degraded = ReadArray("/dev/md2");
+    ASSERT_EQ(RAIDStop("/dev/md2"), 0);
+    EXPECT_EQ(RAIDAssembleByInfo(degraded.get()), 0);
+    EXPECT_EQ(StatusOf("/dev/md2"), RAID_STATUS_DEGRADED);
+    ASSERT_EQ(RAIDStop("/dev/md2"), 0);
+    test::Happen("pull 4");
+    EXPECT_EQ(RAIDAssembleByInfo(record.get()), -1) << "two of four";
+    EXPECT_EQ(StatusOf("/dev/md2"), 0);
+}
+
+TEST_F(MachineUsedDisks, AllOfALargeDiskIsUsed)
+{
+    constexpr int tib = 1 << 20;
+    test::PlugLargeDisks(2, 3 * tib);
+    for (const int bay : {1, 2})
+        Partition(bay);
+    constexpr int64_t sectors = int64_t{6} << 30;
+    int64_t start = 0;
+    EXPECT_EQ(RCPartitionConfigs(3, "sda", &start, nullptr), sectors - 33 - 9437184);
+    EXPECT_EQ(start, 9437184);
+    uint64_t kernel = 0;
+    ASSERT_EQ(DiskSizeGet("/dev/sda3", &kernel), 1);
+    EXPECT_EQ(kernel, static_cast<uint64_t>(sectors - 33 - 9437184));
+    int kind = 0;
+    EXPECT_EQ(PartitionTableTypeGet("/dev/sda", &kind), 0);
+    EXPECT_EQ(kind, PARTITION_TABLE_GPT);
+    ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_1, .members = {"/dev/sda3", "/dev/sdb3"}, .sync = false}),
+              0);
+    EXPECT_GT(ReadArray("/dev/md2")->cbArray, uint64_t{2990} << 30);
+    ASSERT_EQ(LVMCreate(test::MakeList({"/dev/md2"}).get(), "/dev/vg1", "lv", nullptr, 0), 0);
+    EXPECT_GT(std::stoull(Told("blockdev --getsize64 /dev/vg1/lv")), uint64_t{2990} << 30);
+    EXPECT_EQ(PartitionClean("/dev/sda", PARTITION_SYSTEM), -1) << "in use";
+    EXPECT_EQ(LVMRemove("/dev/vg1", "lv"), 0);
+    EXPECT_EQ(LVMVgRemove("/dev/vg1"), 0);
+    EXPECT_EQ(RAIDRemove(ReadArray("/dev/md2").get()), 0);
+    EXPECT_EQ(PartitionClean("/dev/sda", PARTITION_SYSTEM | PARTITION_DATA), 0);
+    EXPECT_EQ(Told("ls /sys/block/sda | grep -c sda || true"), "0\n");
+}
+
+// Sectors of 4,096 bytes: every geometry of ours counts in 512.
+TEST_F(MachineUsedDisks, OtherSectorsAreRefusedBeforeAnythingIsWritten)
+{
+    Told("truncate -s 64M /tmp/image && losetup -b 4096 /dev/loop0 /tmp/image");
+    const std::string before = Told("sha256sum /tmp/image");
+    EXPECT_NE(Shell("/sbin/sfdisk -M1 /dev/loop0").status, 0);
+    EXPECT_THAT(Shell("/sbin/sfdisk -N1 -uS -q -f -j256 -z100 -tfd -F /dev/loop0").output, HasSubstr("4096"));
+    EXPECT_EQ(PartitionAddTable("/dev/loop0"), -1);
+    Told("losetup -d /dev/loop0");
+    EXPECT_EQ(Told("sha256sum /tmp/image && rm /tmp/image"), before);
+}
+
+}  // namespace
