@@ -146,7 +146,8 @@ TAVO_API int TAVOServiceSettingGet(int idShare, TAVOSERVICESHARE *pShare);
 TAVO_API int TAVOServiceVolumeGetbyLink(const char *szLink, char *szVolume, int cbVolume, char *szPath, int cbPath);
 
 /* 1 when the enable key of data folder idShare is "yes" in /etc/tavoinfo.conf, in any case of letters; else 0. For the
- * download scheduler (4) the answer stands in its own settings, /usr/tavo/etc/download.conf. ERR_BAD_PARAMETERS: bad id. */
+ * download scheduler (4) the answer comes from its own settings, /usr/tavo/etc/download.conf: 0 when the key is missing;
+ * when the file cannot be read, 0 with ERR_OPEN_FAILED or another code of TLIBFileGetKeyValue. ERR_BAD_PARAMETERS: bad id. */
 TAVO_API int TAVOServiceEnableGet(int idShare);
 
 /* 1 when service id is enabled, bound and running, as its status handler has it; else 0. ERR_BAD_PARAMETERS: bad id, or
@@ -233,13 +234,14 @@ TAVO_API int TAVOServiceThirdPartyAll(const char *szAction);
  * and its link under /var/services leads to it. fDelete 0 keeps the data of a folder that is released; 1 deletes it.
  */
 
-/* Chooses the volume of data folder idShare: the one that its link names when that is still there, else the mounted and
- * writable one with the most free space. Its path goes to szVolume. Returns its number, 0 with ERR_NO_SERVICE_VOLUME,
+/* Chooses the volume of data folder idShare: the one that its link names when that is mounted and the folder exists,
+ * else the mounted and writable one with the most free space. Its path goes to szVolume. Returns its number, 0 with ERR_NO_SERVICE_VOLUME,
  * -1 with ERR_BAD_PARAMETERS. */
 TAVO_API int TAVOServiceNewVolumeDecide(int idShare, char *szVolume, int cbVolume);
 
-/* Binds data folder idShare to volume szVolume: creates the share, then sets the link. Returns 0 or -1; a share that
- * was created stays when the link fails. */
+/* Binds data folder idShare to volume szVolume: creates the share, then sets the link. A volume that is not mounted is
+ * accepted, and logged as an error: what is written there is on the system disk. Returns 0, or -1 with the code of
+ * TAVOServiceShareCreate or TAVOServiceLinkSet; a share that was created stays when the link fails. */
 TAVO_API int TAVOServiceSet(int idShare, const char *szVolume);
 
 /* The path of data folder idShare on volume szVolume goes to szPath. Returns its length with the NUL, or -1 with
@@ -258,7 +260,7 @@ TAVO_API int TAVOServiceShareUpdate(int idShare, const char *szVolume);
 TAVO_API int TAVOServiceShareRemove(int idShare, int fDelete);
 
 /* 1 when the folder behind the link is empty, 0 when not, -1 with ERR_BAD_PARAMETERS, or ERR_MAKE_PATH when it cannot be
- * read. */
+ * opened or reading it fails. */
 TAVO_API int TAVOServiceShareIsEmpty(int idShare);
 
 /* Points the link of data folder idShare at szTarget; the link is replaced, what is no link stays.
@@ -268,8 +270,8 @@ TAVO_API int TAVOServiceShareIsEmpty(int idShare);
  *   ERR_MKDIR_FAILED      /var/services or the link could not be created */
 TAVO_API int TAVOServiceLinkSet(int idShare, const char *szTarget);
 
-/* Removes the link; one that is not there is no failure. Returns 0, or -1 with ERR_BAD_PARAMETERS, or ERR_REMOVE_FAILED
- * when what stands there is no link. */
+/* Removes the link; a missing link is not a failure. Returns 0, or -1 with ERR_BAD_PARAMETERS, or ERR_REMOVE_FAILED when
+ * something else is in its place or the link cannot be removed. */
 TAVO_API int TAVOServiceLinkRemove(int idShare);
 
 /* Releases data folders: the link, then the share. Of one folder, of a service (by row or by id), of every service that

@@ -1,4 +1,4 @@
-// Tells whether the service behind a data folder is enabled.
+// Whether the service behind a data folder is enabled.
 #include "tavo_service.h"
 
 #include "core/detail/fault.h"
@@ -13,6 +13,19 @@ constexpr int kDownload = 4;
 // The download scheduler keeps settings of its own; its enabled flag there is what counts.
 constexpr const char *kDownloadSettings = "/usr/tavo/etc/download.conf";
 
+// A key that the file lacks has the value "" and is not a failure.
+struct DownloadSetting {
+    explicit DownloadSetting(const char *key) noexcept
+    {
+        const tavo::KeepFault keep;
+        if (TLIBFileGetKeyValue(kDownloadSettings, key, value, sizeof value, 0) < 0)
+            code = TLIBErrGet();
+    }
+
+    char value[8] = "";
+    int code = ERR_SUCCESS;
+};
+
 }  // namespace
 
 extern "C" int TAVOServiceEnableGet(int idShare)
@@ -23,10 +36,10 @@ extern "C" int TAVOServiceEnableGet(int idShare)
     if (idShare != kDownload)
         return row->share.szEnableKey[0] && tavo::SettingIs(tavo::kSettings, row->share.szEnableKey, "yes");
 
-    char value[8];
-    if (TLIBFileGetKeyValue(kDownloadSettings, row->share.szEnableKey, value, sizeof value, 0) < 0) {
-        LogError("%s(%d)[%X] Failed to get info of download deck", TLIBErrGet());
-        return 0;
+    const DownloadSetting setting(row->share.szEnableKey);
+    if (setting.code != ERR_SUCCESS) {
+        LogError("%s(%d)[%X] Failed to get info of download deck", setting.code);
+        return FailZero(setting.code);
     }
-    return ::strcasecmp(value, "yes") == 0;
+    return ::strcasecmp(setting.value, "yes") == 0;
 }

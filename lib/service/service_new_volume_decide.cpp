@@ -5,7 +5,9 @@
 #include "service/detail/service_table.h"
 #include "service/detail/volume_list.h"
 
+#include <algorithm>
 #include <cstdio>
+#include <vector>
 
 #include <sys/statvfs.h>
 
@@ -19,18 +21,25 @@ unsigned long long FreeBytes(const tavo::Volume &volume)
     return static_cast<unsigned long long>(space.f_bavail) * space.f_frsize;
 }
 
-// The volume that the service's data lies on already; 0 when its folder is gone.
-int OldVolume(int idShare)
+// The mounted volume that holds the service's data; 0 when its folder is gone. A folder that is found where the volume is
+// not mounted is on the system's own disk.
+int OldVolume(int idShare, const std::vector<tavo::Volume> &mounted)
 {
     TAVOSERVICESHARE share;
-    return TAVOServiceSettingGet(idShare, &share) == 1 ? tavo::VolumeNumber(tavo::VolumeOf(share.szVolume)) : 0;
+    if (TAVOServiceSettingGet(idShare, &share) != 1)
+        return 0;
+    const int number = tavo::VolumeNumber(tavo::VolumeOf(share.szVolume));
+    return std::any_of(mounted.begin(), mounted.end(),
+                       [&](const tavo::Volume &volume) { return volume.number == number; })
+               ? number
+               : 0;
 }
 
-int RoomiestVolume()
+int RoomiestVolume(const std::vector<tavo::Volume> &mounted)
 {
     int best = 0;
     unsigned long long most = 0;
-    for (const tavo::Volume &volume : tavo::MountedVolumes()) {
+    for (const tavo::Volume &volume : mounted) {
         const unsigned long long space = FreeBytes(volume);
         if (space > most) {
             most = space;
@@ -47,9 +56,10 @@ extern "C" int TAVOServiceNewVolumeDecide(int idShare, char *szVolume, int cbVol
     if (!tavo::FindServiceShare(idShare) || !szVolume || cbVolume <= 0)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        int number = OldVolume(idShare);
+        const std::vector<tavo::Volume> mounted = tavo::MountedVolumes();
+        int number = OldVolume(idShare, mounted);
         if (number == 0)
-            number = RoomiestVolume();
+            number = RoomiestVolume(mounted);
         if (number == 0)
             return static_cast<int>(FailZero(ERR_NO_SERVICE_VOLUME));
         const std::string path = "/volume" + std::to_string(number);

@@ -7,6 +7,7 @@
 
 #include "core/detail/guard.h"
 #include "core/detail/keep_fault.h"
+#include "core/detail/process_list.h"
 #include "service/detail/process_named.h"
 #include "service/detail/service_table.h"
 #include "service/detail/settings_files.h"
@@ -43,7 +44,10 @@ bool IsRunning(const char *proc)
 {
     if (!proc)
         return true;
-    return std::strchr(proc, '/') ? TLIBProcAliveByPidFile(proc) : tavo::IsProcessNamed(proc);
+    if (!std::strchr(proc, '/'))
+        return tavo::IsProcessNamed(proc);
+    // A daemon that has ended takes signals until its parent has asked for its status.
+    return TLIBProcAliveByPidFile(proc) && !tavo::IsZombie(TLIBReadPidFile(proc));
 }
 
 bool IsOn(const TAVOSERVICE &service)

@@ -34,17 +34,36 @@ std::string ReadSmall(int proc, const std::string &name)
     return text;
 }
 
+// What /proc/PID/stat begins with: "PID (NAME) STATE ...".
+struct Status {
+    explicit Status(std::string_view text)
+    {
+        const size_t open = text.find('(');
+        const size_t close = text.rfind(')');  // a name may hold any character
+        if (open == text.npos || close == text.npos || close + 2 >= text.size())
+            return;
+        name = text.substr(open + 1, close - open - 1);
+        state = text[close + 2];
+    }
+
+    // Ended, and kept in the table until its parent asks for the status.
+    bool IsZombie() const { return state == 'Z' || state == 'X'; }
+
+    std::string name;
+    char state = 0;  // 0: there is no such process
+};
+
+// Empty when the process does not run any more.
 std::string Command(int proc, const std::string &pid)
 {
     std::string text = ReadSmall(proc, pid + "/cmdline");
     while (!text.empty() && text.back() == '\0')
         text.pop_back();
     if (text.empty()) {
-        text = ReadSmall(proc, pid + "/comm");
-        if (text.empty())
+        const Status status(ReadSmall(proc, pid + "/stat"));
+        if (!status.state || status.IsZombie())
             return text;
-        text.pop_back();
-        text = "[" + text + "]";
+        text = "[" + status.name + "]";
     }
     // One process is one line, whatever it calls itself.
     std::replace(text.begin(), text.end(), '\0', ' ');
@@ -76,6 +95,12 @@ std::vector<Process> ListProcesses()
     }
     std::sort(processes.begin(), processes.end(), [](const Process &a, const Process &b) { return a.pid < b.pid; });
     return processes;
+}
+
+bool IsZombie(pid_t pid)
+{
+    const Fd proc(::open("/proc", O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    return proc && Status(ReadSmall(proc.Get(), std::to_string(pid) + "/stat")).IsZombie();
 }
 
 std::string ProcessLine(const Process &process)

@@ -15,8 +15,12 @@ struct Process {
     std::string command;  // the arguments joined by blanks, or "[NAME]" of a process without any (a kernel thread)
 };
 
-// Every process, the caller's own too, by ascending pid. Empty when there is no /proc. Throws bad_alloc.
+// Every process that runs, the caller's own too, by ascending pid; those that have ended and wait for their parent are left
+// out. Empty when there is no /proc. Throws bad_alloc.
 std::vector<Process> ListProcesses();
+
+// Whether the process has ended and only waits for its parent to ask for its status. Throws bad_alloc.
+bool IsZombie(pid_t pid);
 
 // The line that a process table shows for it: "PID ARGUMENTS".
 std::string ProcessLine(const Process &process);

@@ -5,6 +5,7 @@
 #include "tavo_hash.h"
 #include "tavo_section.h"
 
+#include "core/detail/keep_fault.h"
 #include "core/detail/list_owner.h"
 #include "core/detail/lock_hold.h"
 
@@ -48,6 +49,8 @@ int RecordShare(const char *name, const std::string &path)
         return code;
     if (TLIBSzHashSetValue(share.Addr(), "path", path.c_str()) < 0)
         return ERR_OUT_OF_MEMORY;
+    // A share that is not recorded yet is not a failure, so the code that says so must not reach the caller.
+    const KeepFault keep;
     const int found = ErrTLIBFileSetSection(kShares, name, nullptr, share.Get(), 1, nullptr);
     if (found < 0 || (found == 0 && ErrTLIBFileAddSection(kShares, name, share.Get(), nullptr) < 0))
         return TLIBErrGet();

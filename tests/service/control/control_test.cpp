@@ -9,6 +9,7 @@
 #include "support/fault_state.h"
 #include "support/scenario.h"
 #include "support/scratch_dir.h"
+#include "support/stale_stack.h"
 
 #include <gmock/gmock.h>
 
@@ -22,6 +23,7 @@
 
 #include <pwd.h>
 #include <sys/mount.h>
+#include <sys/prctl.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -397,6 +399,23 @@ TEST_F(Services, TheOldVolumeIsKeptAndAFullDeskHasNone)
     EXPECT_THAT(ScriptCalls(), IsEmpty());
 }
 
+// A folder at the place of a volume that is not mounted is on the system's disk.
+TEST_F(Services, AnUnmountedVolumeIsNeverChosenAndIsLoggedWhenNamed)
+{
+    std::filesystem::create_directory("/volume7");
+    test::ForgetFault();
+    EXPECT_EQ(TAVOServiceSet(1, "/volume7"), 0) << "callers bind before they mount";
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    EXPECT_THAT(log_.Texts(), testing::Contains(testing::MatchesRegex(
+                                  "service_set:[0-9]+ /volume7 is not mounted: /volume7/web is on the system disk")));
+
+    char volume[52];
+    ASSERT_EQ(LinkTarget("/var/services/web"), "/volume7/web");
+    EXPECT_EQ(TAVOServiceNewVolumeDecide(1, volume, sizeof volume), 2);
+    EXPECT_STREQ(volume, "/volume2");
+    std::filesystem::remove_all("/volume7");
+}
+
 TEST_F(Services, AVolumeGoesAndComesBack)
 {
     ASSERT_EQ(TAVOServiceActionSet(0, TAVO_SERVICE_ENABLE), 0);
@@ -422,6 +441,34 @@ TEST_F(Services, AVolumeGoesAndComesBack)
     EXPECT_TRUE(std::filesystem::exists("/volume2/web"));
 }
 
+// A share that was not recorded yet is added; a caller that looks at the code after a success finds its own.
+TEST_F(Services, SuccessLeavesTheErrorStateAlone)
+{
+    for (const int id : {0, 1, 3, 7, 8, 10, 11}) {
+        TLIBErrSet(ERR_ACCESS_DENIED);
+        EXPECT_EQ(TAVOServiceActionSet(id, TAVO_SERVICE_ENABLE), 0) << id;
+        EXPECT_THAT(TLIBErrGet(), testing::AnyOf(ERR_ACCESS_DENIED, ERR_SUCCESS)) << id;
+    }
+}
+
+// A process that has ended keeps its pid until its parent asks for the status: it is not a running daemon.
+TEST(ServiceStatus, DoesNotCountTheDead)
+{
+    if (test::RootLacks("proc"))
+        GTEST_SKIP() << "no /proc here";
+    const pid_t daemon = ::fork();
+    if (daemon == 0) {
+        ::prctl(PR_SET_NAME, "crond");
+        ::_exit(0);
+    }
+    siginfo_t info;
+    ASSERT_EQ(::waitid(P_PID, static_cast<id_t>(daemon), &info, WEXITED | WNOWAIT), 0);
+    EXPECT_EQ(TAVOServiceStatusGet(21), 0) << "found by its name";
+    test::WriteFile("/var/run/tavologd.pid", std::to_string(daemon) + "\n");
+    EXPECT_EQ(TAVOServiceStatusGet(29), 0) << "found by its pid file";
+    EXPECT_EQ(::waitpid(daemon, nullptr, 0), daemon);
+}
+
 // The links' folder is open to everybody on some appliances: what stands in a link's place may be a trap.
 TEST_F(Services, NothingButALinkIsReplaced)
 {
@@ -433,6 +480,16 @@ TEST_F(Services, NothingButALinkIsReplaced)
     EXPECT_EQ(TAVOServiceLinkRemove(1), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_REMOVE_FAILED, "service_link_remove"}));
     EXPECT_EQ(test::ReadFile("/var/services/web/precious"), "x");
+
+    // No link can be below a file, so there is none to remove.
+    std::filesystem::rename("/var/services", "/var/services.kept");
+    test::WriteFile("/var/services", "");
+    for (const mode_t left : {S_IFLNK, S_IFREG}) {
+        test::FillStack(left);
+        EXPECT_EQ(TAVOServiceLinkRemove(1), 0);
+    }
+    std::filesystem::remove("/var/services");
+    std::filesystem::rename("/var/services.kept", "/var/services");
 
     ASSERT_EQ(::mkdir("/volume1/elsewhere", 0755), 0);
     ASSERT_EQ(::symlink("/volume1/elsewhere", "/volume1/photo"), 0);
@@ -684,6 +741,12 @@ TEST(ServiceEnableGet, TakesYesInAnyCase)
     ASSERT_EQ(log.Lines().size(), 1u);
     EXPECT_THAT(log.Lines()[0].text,
                 testing::MatchesRegex("service_enable_get\\([0-9]+\\)\\[900\\] Failed to get info of download deck"));
+    // A scheduler that has never been configured has no such key.
+    test::WriteFile("/usr/tavo/etc/download.conf", "other=yes\n");
+    test::ForgetFault();
+    test::FillStack("yes");
+    EXPECT_EQ(TAVOServiceEnableGet(4), 0);
+    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
     test::WriteFile("/usr/tavo/etc/download.conf", "download_enabled=Yes\n");
     EXPECT_EQ(TAVOServiceEnableGet(4), 1);
     std::filesystem::remove("/usr/tavo/etc/download.conf");

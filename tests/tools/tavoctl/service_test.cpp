@@ -216,8 +216,18 @@ TEST_F(TavoctlService, VolumeBindsTheFoldersAndRestoreFindsThemAgain)
     EXPECT_EQ(LinkTarget("/var/services/web"), "/volume1/web");
     EXPECT_EQ(Tavoctl({"service", "status", "web"}).status, 0);
 
-    // It is gone for good: another one takes its place.
+    // It is gone for good: another one takes its place, but no service starts without its data unasked.
     ASSERT_EQ(::umount2("/volume1", MNT_DETACH), 0);
+    const test::Ran refused = Tavoctl({"service", "enable", "web"});
+    EXPECT_EQ(refused.status, 3);
+    EXPECT_THAT(refused.err, HasSubstr("the data of web is on /volume1, which is not mounted"));
+    EXPECT_EQ(Tavoctl({"service", "enable", "--dry-run", "web"}).status, 3);
+    EXPECT_EQ(LinkTarget("/var/services/web"), "/volume1/web");
+    EXPECT_EQ(Tavoctl({"service", "enable", "--force", "web"}).status, 0);
+    EXPECT_EQ(LinkTarget("/var/services/web"), "/volume2/web");
+    EXPECT_EQ(Tavoctl({"service", "volume", "--force", "web", "/volume1"}).status, 0);
+    EXPECT_EQ(LinkTarget("/var/services/web"), "/volume1/web");
+    std::filesystem::remove_all("/volume1/web");
     EXPECT_EQ(Tavoctl({"service", "restore"}).status, 0);
     EXPECT_EQ(LinkTarget("/var/services/web"), "/volume2/web");
 }

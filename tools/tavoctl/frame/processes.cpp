@@ -90,10 +90,12 @@ std::string CommandLine(pid_t pid)
     while (words.ends_with('\0'))
         words.pop_back();
     std::replace(words.begin(), words.end(), '\0', ' ');
-    std::string name;
-    if (words.empty() && std::getline(std::ifstream(folder + "/comm"), name))
-        words = "[" + name + "]";
-    return words;
+    const std::string stat = words.empty() ? ReadAll(folder + "/stat") : "";
+    const std::size_t name = stat.find('(');
+    const std::size_t end = stat.rfind(") ");
+    if (name == std::string::npos || end == std::string::npos || stat.compare(end + 2, 1, "Z") == 0)
+        return words;
+    return "[" + stat.substr(name + 1, end - name - 1) + "]";
 }
 
 pid_t ProcessOf(const std::string &name)

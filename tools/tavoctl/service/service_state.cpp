@@ -47,7 +47,7 @@ void AddProcess(ServiceState &state, const std::string &proc)
 {
     if (proc.find('/') == std::string::npos)
         state.pid = ProcessOf(proc);
-    else if (TLIBProcAliveByPidFile(proc.c_str()) == 1)
+    else if (TLIBProcAliveByPidFile(proc.c_str()) == 1 && !CommandLine(TLIBReadPidFile(proc.c_str())).empty())
         state.pid = TLIBReadPidFile(proc.c_str());
     state.running = state.pid > 0;
     if (state.pid > 0)
@@ -114,6 +114,12 @@ std::vector<std::string> MountedVolumes()
             volumes.insert(path);
     }
     return {volumes.begin(), volumes.end()};
+}
+
+bool IsMounted(const std::string &volume)
+{
+    const std::vector<std::string> volumes = MountedVolumes();
+    return std::find(volumes.begin(), volumes.end(), volume) != volumes.end();
 }
 
 }  // namespace tavoctl

@@ -8,6 +8,7 @@
 
 #include "tavo_service.h"
 
+#include <algorithm>
 #include <climits>
 
 #include <sys/stat.h>
@@ -43,6 +44,24 @@ void AwaitRunning(int id, int seconds)
                   .status = exit_failed};
 }
 
+// The library binds a folder whose volume is away to another volume, where it is empty: the service then starts without
+// its data.
+void RequireVolumes(int id)
+{
+    for (const int32_t folder : FoldersOf(id)) {
+        TAVOSERVICESHARE share = {};
+        TAVOServiceSettingGet(folder, &share);
+        const std::string target = share.szVolume;
+        const std::string volume = target.substr(0, target.find('/', 1));
+        if (volume.starts_with("/volume") && !IsMounted(volume))
+            throw Failure{.attempted = std::string("enable ") + TAVOServiceNameGet(id),
+                          .reason = std::string("the data of ") + share.szShare + " is on " + volume +
+                                    ", which is not mounted",
+                          .hint = "--force uses an empty folder on another volume",
+                          .status = exit_not_found};
+    }
+}
+
 // One verb an action; the actions differ in their number and in what there is to say.
 template <class Action>
 class ServiceSwitch : public Verb {
@@ -54,11 +73,15 @@ class ServiceSwitch : public Verb {
         arguments.Texts("SERVICE", names_, "the name of the service", 1, ServiceNames);
         if (Action::starts)
             arguments.Number("--wait", "SECONDS", wait_, "until it runs, at most that long; else it is a failure", 1);
+        if (Action::binds)
+            arguments.Flag("--force", force_, "also when the volume of its data is not mounted");
     }
 
     int Run(const Call &call) override
     {
         const std::vector<int> ids = FindServices(names_);
+        if (Action::binds && !force_)
+            std::for_each(ids.begin(), ids.end(), RequireVolumes);
         if (call.dry_run)
             return ShowFolders(call, ids);
         for (const int id : ids) {
@@ -93,16 +116,19 @@ class ServiceSwitch : public Verb {
 
     std::vector<std::string> names_;
     int wait_ = 0;
+    bool force_ = false;
 };
 
 struct Enable {
     static constexpr int code = TAVO_SERVICE_ENABLE;
+    static constexpr bool binds = true;
     static constexpr bool starts = true;
     static constexpr VerbInfo info = {
         "enable", changes | tells_before,
         "Enables services. Binds their data folders, on the volume where they are or else on the one with the most "
         "free "
-        "space, sets their keys and starts them. With --dry-run, lists the folders that it would bind.",
+        "space, sets their keys and starts them. Refuses a service whose data is on a volume that is not mounted. With "
+        "--dry-run, lists the folders that it would bind.",
         "tavoctl service enable samba\n"
         "tavoctl service enable --wait 10 ftp ssh\n"
         "tavoctl service enable --dry-run media"};
@@ -110,6 +136,7 @@ struct Enable {
 
 struct Disable {
     static constexpr int code = TAVO_SERVICE_DISABLE;
+    static constexpr bool binds = false;
     static constexpr bool starts = false;
     static constexpr VerbInfo info = {
         "disable", changes,
@@ -120,6 +147,7 @@ struct Disable {
 
 struct Start {
     static constexpr int code = TAVO_SERVICE_START;
+    static constexpr bool binds = false;
     static constexpr bool starts = true;
     static constexpr VerbInfo info = {"start", changes, "Starts services; whether they are enabled stays as it is.",
                                       "tavoctl service start --wait 10 crond"};
@@ -127,6 +155,7 @@ struct Start {
 
 struct Stop {
     static constexpr int code = TAVO_SERVICE_STOP;
+    static constexpr bool binds = false;
     static constexpr bool starts = false;
     static constexpr VerbInfo info = {"stop", changes,
                                       "Stops services until they are started again; whether they are enabled stays as "
@@ -136,6 +165,7 @@ struct Stop {
 
 struct Restart {
     static constexpr int code = TAVO_SERVICE_RESTART;
+    static constexpr bool binds = false;
     static constexpr bool starts = true;
     static constexpr VerbInfo info = {"restart", changes, "Restarts services.",
                                       "tavoctl service restart DB\n"

@@ -7,7 +7,6 @@
 
 #include "tavo_service.h"
 
-#include <algorithm>
 #include <climits>
 
 namespace tavoctl {
@@ -21,8 +20,7 @@ std::string VolumePath(const std::string &word)
 
 void RequireMounted(const std::string &volume)
 {
-    const std::vector<std::string> volumes = MountedVolumes();
-    if (std::find(volumes.begin(), volumes.end(), volume) == volumes.end())
+    if (!IsMounted(volume))
         throw Failure{.attempted = "use the volume " + volume,
                       .reason = "it is not mounted",
                       .hint = "volumes are /volume1, /volume2, ... in /proc/mounts",
@@ -36,19 +34,22 @@ class ServiceVolume : public Verb {
                                       "services that use them. The data "
                                       "itself is not moved.",
                                       "tavoctl service volume web /volume2\n"
+                                      "tavoctl service volume --force web /volume3\n"
                                       "tavoctl service volume --dry-run media 2"};
 
     void Declare(Arguments &arguments) override
     {
         arguments.Text("SERVICE", name_, "the name of the service", ServiceNames);
         arguments.Text("VOLUME", volume_, "the volume, such as /volume2", MountedVolumes);
+        arguments.Flag("--force", force_, "also when the volume is not mounted: data goes to the system disk until then");
     }
 
     int Run(const Call &call) override
     {
         const int id = FindService(name_);
         const std::string volume = VolumePath(volume_);
-        RequireMounted(volume);
+        if (!force_)
+            RequireMounted(volume);
         const std::vector<int32_t> folders = FoldersOf(id);
         if (folders.empty())
             throw UsageFailure("bind " + name_ + " to " + volume, "it keeps no data on a volume");
@@ -79,6 +80,7 @@ class ServiceVolume : public Verb {
 
     std::string name_;
     std::string volume_;
+    bool force_ = false;
 };
 
 class ServiceRestore : public Verb {
