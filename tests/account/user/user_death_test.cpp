@@ -4,13 +4,13 @@
 
 #include "account/user/user_fixture.h"
 #include "support/rounds.h"
+#include "support/traced_call.h"
 
 #include <gtest/gtest.h>
 
 #include <shadow.h>
 #include <signal.h>
 #include <sys/mman.h>
-#include <sys/ptrace.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -24,41 +24,6 @@ using test::AllFiles;
 using test::GetUser;
 
 namespace {
-
-// Runs `work` in a child that dies at its Nth system call. False when it came to its end instead.
-bool DiesAtCall(int n, const std::function<void()> &work)
-{
-    const pid_t child = ::fork();
-    if (child == 0) {
-        ::ptrace(PTRACE_TRACEME, 0, nullptr, nullptr);
-        ::raise(SIGSTOP);
-        work();
-        ::_exit(0);
-    }
-    int status = 0;
-    ::waitpid(child, &status, 0);
-    ::ptrace(PTRACE_SETOPTIONS, child, nullptr, reinterpret_cast<void *>(PTRACE_O_TRACESYSGOOD | PTRACE_O_EXITKILL));
-    for (int stops = 0; !WIFEXITED(status) && !WIFSIGNALED(status);) {
-        if (WIFSTOPPED(status) && WSTOPSIG(status) == (SIGTRAP | 0x80) && ++stops == 2 * n - 1) {
-            ::kill(child, SIGKILL);
-            ::waitpid(child, &status, 0);
-            return true;
-        }
-        ::ptrace(PTRACE_SYSCALL, child, nullptr, nullptr);
-        ::waitpid(child, &status, 0);
-    }
-    return false;
-}
-
-bool CanTrace()
-{
-    const pid_t child = ::fork();
-    if (child == 0)
-        ::_exit(::ptrace(PTRACE_TRACEME, 0, nullptr, nullptr) == 0 ? 0 : 1);
-    int status = 0;
-    ::waitpid(child, &status, 0);
-    return status == 0;
-}
 
 void RestoreFiles(const std::array<std::string, 4> &files)
 {
@@ -96,7 +61,7 @@ void CheckFiles(const std::set<std::string> &committed)
 
 TEST(UserDeath, AtEverySystemCall)
 {
-    if (!CanTrace())
+    if (!test::CanTrace())
         GTEST_SKIP() << "no ptrace here";
     for (const char *name : {"alice", "bob", "carol"})
         ASSERT_EQ(AddUser({.name = name, .password = name}), 0);
@@ -125,7 +90,7 @@ TEST(UserDeath, AtEverySystemCall)
         for (int n = 1;; n += test::Stride()) {
             RestoreFiles(before);
             ASSERT_TRUE(GetUser("alice"));
-            if (!DiesAtCall(n, work))
+            if (!test::DiesAtCall(n, work))
                 break;
             ++calls;
             const bool alice = GetUser("alice") != nullptr;  // opens, and so repairs
