@@ -77,6 +77,36 @@ void EachAllocation::Disarm()
 #endif
 }
 
+void StartCounting()
+{
+    armed = {true, 0, false, 0};
+}
+
+void FailAllocation(int n)
+{
+    armed.until_failure = n;
+}
+
+void StopFailing()
+{
+    armed.until_failure = 0;
+}
+
+bool AllocationFailed()
+{
+    return armed.fired;
+}
+
+int StopCounting()
+{
+    armed.on = false;
+#ifdef TEST_WITH_ASAN
+    return 0;  // as above
+#else
+    return armed.live;
+#endif
+}
+
 }  // namespace test
 
 using test::armed;

@@ -41,6 +41,14 @@ class EachAllocation {
     int left_allocated_ = 0;
 };
 
+// The same by hand, for a call in a process of its own. Counting begins with StartCounting; from FailAllocation on the
+// Nth allocation fails, until StopFailing.
+void StartCounting();
+void FailAllocation(int n);
+void StopFailing();
+bool AllocationFailed();
+int StopCounting();  // blocks allocated since StartCounting less blocks freed
+
 }  // namespace test
 
 #endif

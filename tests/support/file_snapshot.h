@@ -1,0 +1,44 @@
+// What is in some folders, as a value that can be compared and put back.
+#ifndef TESTS_SUPPORT_FILE_SNAPSHOT_H
+#define TESTS_SUPPORT_FILE_SNAPSHOT_H
+
+#include <map>
+#include <string>
+#include <vector>
+
+#include <sys/stat.h>
+
+namespace test {
+
+struct KeptFile {
+    struct stat facts;
+    std::string content;  // of a file; the target of a link
+
+    bool SameContent(const KeptFile &other) const
+    {
+        return (facts.st_mode & S_IFMT) == (other.facts.st_mode & S_IFMT) && content == other.content;
+    }
+};
+
+using KeptFiles = std::map<std::string, KeptFile>;
+
+class FileSnapshot {
+  public:
+    explicit FileSnapshot(std::vector<std::string> folders);
+
+    const KeptFiles &Files() const { return files_; }
+
+    // What is there now; the content of files that have not been touched since is taken from here.
+    KeptFiles Now() const;
+
+    // Puts back what has changed, owner, mode and time of change included, and removes what is new.
+    void Restore();
+
+  private:
+    std::vector<std::string> folders_;
+    KeptFiles files_;
+};
+
+}  // namespace test
+
+#endif
