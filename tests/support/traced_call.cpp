@@ -23,31 +23,34 @@ struct NamedCall {
     const char *name;
 };
 
-#define ROW(name) {SYS_##name, #name}
+#define ROW(name)                                                                                                      \
+    {                                                                                                                  \
+        SYS_##name, #name                                                                                              \
+    }
 constexpr NamedCall kNames[] = {
-    ROW(access),      ROW(bind),          ROW(brk),          ROW(capget),
-    ROW(chdir),       ROW(chmod),         ROW(chown),        ROW(clock_nanosleep),
-    ROW(clone),       ROW(close),         ROW(connect),      ROW(dup),
-    ROW(dup2),        ROW(dup3),          ROW(execve),       ROW(exit_group),
-    ROW(faccessat),   ROW(fchmod),        ROW(fchmodat),     ROW(fchown),
-    ROW(fcntl),       ROW(fdatasync),     ROW(flock),        ROW(fsync),
-    ROW(ftruncate),   ROW(futex),         ROW(getdents64),   ROW(getegid),
-    ROW(geteuid),     ROW(getgid),        ROW(getpid),       ROW(getppid),
-    ROW(getrandom),   ROW(gettid),        ROW(getuid),       ROW(ioctl),
-    ROW(kill),        ROW(lchown),        ROW(link),         ROW(lseek),
-    ROW(lstat),       ROW(madvise),       ROW(mkdir),        ROW(mount),
-    ROW(mprotect),    ROW(mremap),        ROW(munmap),       ROW(nanosleep),
-    ROW(openat),      ROW(open),          ROW(pipe2),        ROW(truncate),
-    ROW(poll),        ROW(ppoll),         ROW(prctl),        ROW(pread64),
-    ROW(prlimit64),   ROW(pselect6),      ROW(pwrite64),     ROW(quotactl),
-    ROW(read),        ROW(readlink),      ROW(recvfrom),     ROW(recvmsg),
-    ROW(rename),      ROW(renameat2),     ROW(rmdir),        ROW(rt_sigaction),
+    ROW(access),         ROW(bind),         ROW(brk),        ROW(capget),
+    ROW(chdir),          ROW(chmod),        ROW(chown),      ROW(clock_nanosleep),
+    ROW(clone),          ROW(close),        ROW(connect),    ROW(dup),
+    ROW(dup2),           ROW(dup3),         ROW(execve),     ROW(exit_group),
+    ROW(faccessat),      ROW(fchmod),       ROW(fchmodat),   ROW(fchown),
+    ROW(fcntl),          ROW(fdatasync),    ROW(flock),      ROW(fsync),
+    ROW(ftruncate),      ROW(futex),        ROW(getdents64), ROW(getegid),
+    ROW(geteuid),        ROW(getgid),       ROW(getpid),     ROW(getppid),
+    ROW(getrandom),      ROW(gettid),       ROW(getuid),     ROW(ioctl),
+    ROW(kill),           ROW(lchown),       ROW(link),       ROW(lseek),
+    ROW(lstat),          ROW(madvise),      ROW(mkdir),      ROW(mount),
+    ROW(mprotect),       ROW(mremap),       ROW(munmap),     ROW(nanosleep),
+    ROW(openat),         ROW(open),         ROW(pipe2),      ROW(truncate),
+    ROW(poll),           ROW(ppoll),        ROW(prctl),      ROW(pread64),
+    ROW(prlimit64),      ROW(pselect6),     ROW(pwrite64),   ROW(quotactl),
+    ROW(read),           ROW(readlink),     ROW(recvfrom),   ROW(recvmsg),
+    ROW(rename),         ROW(renameat2),    ROW(rmdir),      ROW(rt_sigaction),
     ROW(rt_sigprocmask), ROW(rt_sigreturn), ROW(sendmsg),    ROW(sendto),
-    ROW(sethostname), ROW(setsid),        ROW(setsockopt),   ROW(socket),
-    ROW(stat),        ROW(statfs),        ROW(statx),        ROW(symlink),
-    ROW(sync),        ROW(tgkill),        ROW(umask),        ROW(uname),
-    ROW(unlink),      ROW(unlinkat),      ROW(utimensat),    ROW(vfork),
-    ROW(wait4),       ROW(waitid),        ROW(write),        ROW(writev),
+    ROW(sethostname),    ROW(setsid),       ROW(setsockopt), ROW(socket),
+    ROW(stat),           ROW(statfs),       ROW(statx),      ROW(symlink),
+    ROW(sync),           ROW(tgkill),       ROW(umask),      ROW(uname),
+    ROW(unlink),         ROW(unlinkat),     ROW(utimensat),  ROW(vfork),
+    ROW(wait4),          ROW(waitid),       ROW(write),      ROW(writev),
 };
 #undef ROW
 
@@ -165,7 +168,8 @@ pid_t StartStopped(const std::function<void()> &work)
 }
 
 // Runs the work and asks at each system call what becomes of it; once something has become of one, the rest goes on unseen.
-Ending RunTraced(const std::function<void()> &work, int seconds, const std::function<Verdict(const SystemCall &)> &judge)
+Ending RunTraced(const std::function<void()> &work, int seconds,
+                 const std::function<Verdict(const SystemCall &)> &judge)
 {
     Ending ending;
     const pid_t child = StartStopped(work);
@@ -225,10 +229,11 @@ bool CanTrace()
     if (!kKnowsRegisters)
         return false;
     bool entered = false;
-    const Ending ending = RunTraced([] { ::syscall(SYS_getppid); }, kLongest, [&](const SystemCall &call) {
-        entered = entered || call.number == SYS_getppid;
-        return Verdict{};
-    });
+    const Ending ending = RunTraced([] { ::syscall(SYS_getppid); }, kLongest,
+                                    [&](const SystemCall &call) {
+                                        entered = entered || call.number == SYS_getppid;
+                                        return Verdict{};
+                                    });
     return entered && ending.IsClean();
 }
 
@@ -291,7 +296,9 @@ std::vector<SystemCall> SystemCallsOf(const std::function<void()> &work)
     });
     if (!calls.empty() && calls.back().number == SYS_exit_group)
         calls.pop_back();
-    const auto is_mark = [](const SystemCall &call) { return call.number == kMark; };
+    const auto is_mark = [](const SystemCall &call) {
+        return call.number == kMark;
+    };
     const auto begin = std::find_if(calls.begin(), calls.end(), is_mark);
     if (begin != calls.end()) {
         calls.erase(std::find_if(begin + 1, calls.end(), is_mark), calls.end());

@@ -41,7 +41,8 @@ class ServiceVolume : public Verb {
     {
         arguments.Text("SERVICE", name_, "the name of the service", ServiceNames);
         arguments.Text("VOLUME", volume_, "the volume, such as /volume2", MountedVolumes);
-        arguments.Flag("--force", force_, "also when the volume is not mounted: data goes to the system disk until then");
+        arguments.Flag("--force", force_,
+                       "also when the volume is not mounted: data goes to the system disk until then");
     }
 
     int Run(const Call &call) override
