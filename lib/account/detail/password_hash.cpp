@@ -2,8 +2,11 @@
 #include "account/detail/password_hash.h"
 
 #include "account/detail/salt_char.h"
+#include "account/detail/setting_switch.h"
 
+#include <cerrno>
 #include <memory>
+#include <new>
 
 #include <crypt.h>
 #include <string.h>
@@ -21,14 +24,34 @@ std::string FreshSetting(time_t now)
     return setting;
 }
 
-std::string Crypt(const std::string &clear, const std::string &setting)
+struct WipeScratch {
+    void operator()(crypt_data *scratch) const noexcept
+    {
+        ::explicit_bzero(scratch, sizeof *scratch);
+        delete scratch;
+    }
+};
+
+std::string Crypt(const char *clear, const std::string &setting)
 {
-    const auto scratch = std::make_unique_for_overwrite<crypt_data>();  // 32 KiB, of which this field is read
+    const std::unique_ptr<crypt_data, WipeScratch> scratch(new crypt_data);  // 32 KiB, of which this field is read
     scratch->initialized = 0;
-    const char *hash = ::crypt_r(clear.c_str(), setting.c_str(), scratch.get());
-    std::string result = hash && *hash != '*' ? hash : "";
-    ::explicit_bzero(scratch.get(), sizeof *scratch);
-    return result;
+    errno = 0;
+    const char *hash = ::crypt_r(clear, setting.c_str(), scratch.get());
+    if (hash && *hash != '*')
+        return hash;
+    if (errno == ENOMEM)
+        throw std::bad_alloc();
+    return {};
+}
+
+// Empty when the system has no random bytes or does not know the method.
+std::string RandomSetting(HashMethod method)
+{
+    char setting[CRYPT_GENSALT_OUTPUT_SIZE];
+    const char *prefix = method == HashMethod::kSha512 ? "$6$" : "$y$";
+    const char *made = ::crypt_gensalt_rn(prefix, 0, nullptr, 0, setting, sizeof setting);
+    return made && *made != '*' ? made : "";
 }
 
 }  // namespace
@@ -41,16 +64,21 @@ std::string HashSetting(std::string_view previous, time_t now)
     return setting;
 }
 
-std::string HashPassword(const std::string &clear, std::string_view previous, time_t now)
+HashMethod ConfiguredHashMethod()
 {
-    std::string hash = Crypt(clear, HashSetting(previous, now));
-    return hash.empty() ? Crypt(clear, FreshSetting(now)) : hash;
+    if (SettingIs(kFactorySettings, "password_hash", "sha512"))
+        return HashMethod::kSha512;
+    return SettingIs(kFactorySettings, "password_hash", "yescrypt") ? HashMethod::kYescrypt : HashMethod::kMd5;
 }
 
-void Forget(std::string &secret) noexcept
+std::string HashPassword(const char *clear, std::string_view previous, time_t now, HashMethod method)
 {
-    ::explicit_bzero(secret.data(), secret.size());
-    secret.clear();
+    if (method != HashMethod::kMd5) {
+        const std::string setting = RandomSetting(method);
+        return setting.empty() ? setting : Crypt(clear, setting);
+    }
+    std::string hash = Crypt(clear, HashSetting(previous, now));
+    return hash.empty() ? Crypt(clear, FreshSetting(now)) : hash;
 }
 
 }  // namespace tavo

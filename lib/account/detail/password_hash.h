@@ -13,11 +13,15 @@ namespace tavo {
 // password, "$6$...") counts as none: all users would share one hash for one password.
 std::string HashSetting(std::string_view previous, time_t now);
 
-// An MD5-crypt hash; empty when the system cannot make one (a password longer than crypt takes, say).
-std::string HashPassword(const std::string &clear, std::string_view previous, time_t now);
+// The methods that "password_hash" in /etc.defaults/tavoinfo.conf names. MD5-crypt is what the appliance's other programs
+// expect, and what an absent or unknown value means.
+enum class HashMethod { kMd5, kSha512, kYescrypt };
 
-// Overwrites a text that was a secret and empties it.
-void Forget(std::string &secret) noexcept;
+HashMethod ConfiguredHashMethod();
+
+// A hash of a new password. MD5-crypt takes its setting from HashSetting, the other methods a random salt of full length
+// from the system. Empty when the system cannot make one (a password longer than crypt takes, say). Throws bad_alloc.
+std::string HashPassword(const char *clear, std::string_view previous, time_t now, HashMethod method = HashMethod::kMd5);
 
 }  // namespace tavo
 

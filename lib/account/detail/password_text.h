@@ -2,15 +2,18 @@
 #ifndef TAVO_ACCOUNT_DETAIL_PASSWORD_TEXT_H
 #define TAVO_ACCOUNT_DETAIL_PASSWORD_TEXT_H
 
-#include "account/detail/password_hash.h"
+#include "account/detail/secret_text.h"
 
-#include <string>
 #include <string_view>
 
 namespace tavo {
 
-std::string UpperCodePage850(std::string_view utf8);  // upper-case, character by character: "ß" stays one
-std::string Utf16LowFirst(std::string_view utf8);     // UTF-16, the low byte of each unit first
+// Upper-case, character by character: "ß" stays one. A password that cannot be converted is never taken for an empty one:
+// 0, or ERR_OP_FAILURE when ICU cannot convert. Throws bad_alloc.
+int UpperCodePage850(std::string_view utf8, SecretBytes &bytes);
+
+// UTF-16, the low byte of each unit first. The same codes.
+int Utf16LowFirst(std::string_view utf8, SecretBytes &bytes);
 
 }  // namespace tavo
 

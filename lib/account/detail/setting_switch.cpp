@@ -8,8 +8,13 @@ namespace tavo {
 
 bool SettingIsYes(const char *path, const char *key)
 {
+    return SettingIs(path, key, "yes");
+}
+
+bool SettingIs(const char *path, const char *key, const char *value)
+{
     const KeepFault keep;
-    return BlTAVOFileCheckKeyValue(path, key, "yes") != 0;
+    return BlTAVOFileCheckKeyValue(path, key, value) != 0;
 }
 
 }  // namespace tavo

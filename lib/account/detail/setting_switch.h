@@ -10,6 +10,9 @@ inline constexpr char kFactorySettings[] = "/etc.defaults/tavoinfo.conf";  // wh
 // Whether the key says "yes". Leaves the error state alone.
 bool SettingIsYes(const char *path, const char *key);
 
+// Whether it has that value.
+bool SettingIs(const char *path, const char *key, const char *value);
+
 }  // namespace tavo
 
 #endif

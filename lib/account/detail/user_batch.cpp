@@ -39,7 +39,8 @@ UserBatch::Outcome UserBatch::Apply(const char *old_name, const TAVOUSER *user)
 UserBatch::Outcome UserBatch::Store(const char *old_name, const TAVOUSER &user, int uid_code, bool uid_is_chosen)
 {
     UserChange change;
-    if (const int code = PrepareUser(db_, old_name, user, ::time(nullptr), change))
+    const Hashing hashing{::time(nullptr), method_};
+    if (const int code = PrepareUser(db_, old_name, user, hashing, change))
         return {.code = code, .absent = old_name && code == ERR_NO_SUCH_USER};
     if (uid_code != 0)
         return {.code = uid_code};

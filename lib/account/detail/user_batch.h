@@ -44,6 +44,7 @@ class UserBatch {
     Outcome Store(const char *old_name, const TAVOUSER &user, int uid_code, bool uid_is_chosen);
 
     const TAVOUSERDB &db_;
+    const HashMethod method_ = ConfiguredHashMethod();
     std::set<std::string> old_keys_;
     std::vector<DoneUser> done_;
 };

@@ -60,8 +60,8 @@ int ReadOld(const TAVOUSERDB &db, std::string_view key, OldUser &old)
 }
 
 // A password that is the stored hash stays, with its Samba hashes; any other is clear text.
-int ChoosePassword(const char *password, const OldUser *old, time_t now, UserChange &change, std::string &hash,
-                   SmbpasswdLine &smb)
+int ChoosePassword(const char *password, const OldUser *old, const Hashing &hashing, UserChange &change,
+                   std::string &hash, SmbpasswdLine &smb)
 {
     if (old && old->shadow.hash == password) {
         hash = old->shadow.hash;
@@ -69,7 +69,8 @@ int ChoosePassword(const char *password, const OldUser *old, time_t now, UserCha
         smb.nt_hash = old->smb.nt_hash;
         return 0;
     }
-    hash = HashPassword(password, old ? std::string_view(old->shadow.hash) : std::string_view(), now);
+    hash = HashPassword(password, old ? std::string_view(old->shadow.hash) : std::string_view(), hashing.now,
+                        hashing.method);
     if (hash.empty())
         return ERR_BAD_PARAMETERS;
     unsigned char digest[16];
@@ -100,7 +101,8 @@ int FindOld(const TAVOUSERDB &db, const char *old_name, UserChange &change, OldU
 
 }  // namespace
 
-int PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user, time_t now, UserChange &change)
+int PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user, const Hashing &hashing,
+                UserChange &change)
 {
     if (!IsAccountName(user.szName, kUserNameChars) || IsDotName(user.szName))
         return ERR_INVALID_USERNAME;
@@ -133,12 +135,13 @@ int PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user
     SmbpasswdLine smb;
     smb.name = name;
     smb.uid = change.uid;
-    smb.changed = SmbChangeTime(now);
-    if (const int code = ChoosePassword(Text(user.szPasswd), old_name ? &old : nullptr, now, change, shadow.hash, smb))
+    smb.changed = SmbChangeTime(hashing.now);
+    if (const int code =
+            ChoosePassword(Text(user.szPasswd), old_name ? &old : nullptr, hashing, change, shadow.hash, smb))
         return code;
     change.passwd_line = FormatPasswdLine(passwd);
     change.misc_line = FormatMiscLine({name, user.nPrivilege, Text(user.szMail)});
-    change.shadow_line = FormatShadowLine(shadow, now);
+    change.shadow_line = FormatShadowLine(shadow, hashing.now);
     change.smb_line = FormatSmbpasswdLine(smb);
     return 0;
 }

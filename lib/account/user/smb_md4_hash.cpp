@@ -11,12 +11,13 @@ extern "C" int TLIBSmbMd4Hash(const char *szPasswd, unsigned char *rgHash)
     if (!szPasswd || !rgHash)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        std::string text = tavo::Utf16LowFirst(szPasswd);
-        struct md4_ctx md4;
+        tavo::SecretBytes text;
+        if (const int code = tavo::Utf16LowFirst(szPasswd, text))
+            return Fail(code);
+        tavo::Wiped<md4_ctx> md4;
         nettle_md4_init(&md4);
         nettle_md4_update(&md4, text.size(), reinterpret_cast<const uint8_t *>(text.data()));
         nettle_md4_digest(&md4, MD4_DIGEST_SIZE, rgHash);
-        tavo::Forget(text);
         return 0;
     });
 }

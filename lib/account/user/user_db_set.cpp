@@ -13,7 +13,7 @@ extern "C" int TAVOUserDBSet(TAVOUSERDB *pDb, const char *szOldName, const TAVOU
         if (tavo::IsDomainName(pUser->szName))
             return 0;
         tavo::UserChange change;
-        int code = tavo::PrepareUser(*pDb, szOldName, *pUser, ::time(nullptr), change);
+        int code = tavo::PrepareUser(*pDb, szOldName, *pUser, {::time(nullptr), tavo::ConfiguredHashMethod()}, change);
         if (code == 0)
             code = tavo::StoreUser(*pDb, change);
         return code == 0 ? 0 : Fail(code);
