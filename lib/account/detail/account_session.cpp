@@ -31,6 +31,8 @@ AccountSession::~AccountSession()
 
 int AccountSession::OpenToRead(std::span<const size_t> stores)
 {
+    if (!is_root_)
+        return text_stores_.Open(stores);
     if (const int code = Lock(kind_.lock, TAVO_LOCK_SHARED))
         return code;
     if (SealHolds(kind_.family) && Open(stores) == 0 && IsCurrent())
@@ -46,6 +48,8 @@ int AccountSession::OpenToRead(std::span<const size_t> stores)
 
 int AccountSession::OpenToChange(unsigned locks)
 {
+    if (!is_root_)
+        return ERR_ACCESS_DENIED;
     if (const int code = Lock(locks, TAVO_LOCK_EXCLUSIVE))
         return code;
     std::vector<size_t> all(kind_.family.stores.size());
@@ -105,10 +109,7 @@ int AccountSession::Open(std::span<const size_t> stores)
     stores_.resize(kind_.family.stores.size());
     for (const size_t index : stores) {
         const char *path = kind_.family.stores[index].path;
-        int code = Btree::Open(path, {O_RDWR, true, 0}, stores_[index]);
-        if (code == ERR_ACCESS_DENIED)  // a program without root's rights may still be allowed to read
-            code = Btree::Open(path, {O_RDONLY, true, 0}, stores_[index]);
-        if (code != 0)
+        if (Btree::Open(path, {O_RDWR, true, 0}, stores_[index]) != 0)
             return ERR_OPEN_FAILED;
     }
     return 0;

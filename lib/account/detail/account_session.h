@@ -6,29 +6,34 @@
 #include "account/detail/btree.h"
 #include "account/detail/store_build.h"
 #include "account/detail/system_lock.h"
+#include "account/detail/text_stores.h"
 
 #include <memory>
 #include <span>
 #include <string>
 #include <vector>
 
+#include <unistd.h>
+
 namespace tavo {
 
 class AccountSession {
   public:
-    explicit AccountSession(const AccountKind &kind) : kind_(kind) {}
+    explicit AccountSession(const AccountKind &kind) : kind_(kind), is_root_(::geteuid() == 0) {}
     ~AccountSession();
     AccountSession(const AccountSession &) = delete;
     AccountSession &operator=(const AccountSession &) = delete;
 
     // Opens the stores of the family that `stores` lists, under the family's lock, shared. When they must be built anew
-    // the lock is taken exclusively, and kept.
-    // 0, ERR_LOCK_FAILED, ERR_OPEN_FAILED; what BuildStores says.
+    // the lock is taken exclusively, and kept. A program that is not root reads the text files instead, without any lock.
+    // 0, ERR_LOCK_FAILED, ERR_OPEN_FAILED; what BuildStores says; what TextStores::Open says.
     int OpenToRead(std::span<const size_t> stores);
 
-    // Takes `locks` and the system's lock exclusively and opens all stores.
+    // Takes `locks` and the system's lock exclusively and opens all stores. ERR_ACCESS_DENIED to all but root.
     int OpenToChange(unsigned locks);
 
+    // To look things up in a store, and to change it.
+    StoreView *View(size_t index) const { return is_root_ ? Store(index) : text_stores_.View(index); }
     Btree *Store(size_t index) const { return stores_[index].get(); }
 
     // To be called before the first change of a store: from here to Seal, a death means that they are built anew.
@@ -51,6 +56,8 @@ class AccountSession {
     bool IsCurrent() const;
 
     const AccountKind &kind_;
+    const bool is_root_;
+    TextStores text_stores_{kind_};
     unsigned locks_ = 0;
     SystemLock system_;
     std::vector<std::unique_ptr<Btree>> stores_;

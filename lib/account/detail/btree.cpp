@@ -2,6 +2,7 @@
 #include "account/detail/btree.h"
 
 #include "account/detail/btree_file.h"
+#include "account/detail/free_name.h"
 #include "account/detail/store_seal.h"
 #include "account/detail/store_sync.h"
 #include "core/detail/owner.h"
@@ -85,12 +86,24 @@ unsigned SequenceFlag(int32_t cursor_type)
     }
 }
 
-// A file that is no store goes, so that the next open can make a new one.
-int RemoveForeign(const char *path)
+// A file that is no store goes, so that the next open can make a new one. Only root clears the names of the families.
+int RemoveForeign(const char *path, bool is_ours)
 {
-    ::unlink(path);
+    if (is_ours && ::geteuid() != 0)
+        return ERR_ACCESS_DENIED;
+    if (is_ours)
+        FreeName(path);
+    else
+        ::unlink(path);
     errno = EINVAL;
     return ERR_DB_OPEN;
+}
+
+// Whether the database has opened the very file that was looked at.
+bool IsSameFile(const DB *db, const StoreFile &file)
+{
+    struct stat st;
+    return ::fstat(db->fd(db), &st) == 0 && st.st_dev == file.device && st.st_ino == file.inode;
 }
 
 }  // namespace
@@ -98,21 +111,28 @@ int RemoveForeign(const char *path)
 int Btree::Open(const char *path, const Options &options, std::unique_ptr<Btree> &out)
 {
     const bool may_create = (options.flags & O_CREAT) != 0;
+    const mode_t mode_of_ours = ModeOfStore(path);
+    const StoreAccess access{mode_of_ours != 0 ? mode_of_ours : options.mode, mode_of_ours != 0};
+    if (access.is_ours && may_create && ::geteuid() != 0)
+        return ERR_ACCESS_DENIED;
     struct stat st;
     if (may_create && ::lstat(path, &st) == 0 && S_ISREG(st.st_mode) &&
         (st.st_size == 0 || (options.flags & O_TRUNC) != 0))
         ::unlink(path);  // an empty file is as good as none to a caller who would create one
-    switch (LookAtBtreeFile(path, options.mode)) {
+    StoreFile file;
+    BtreeFile found = LookAtBtreeFile(path, access, file);
+    if (found == BtreeFile::missing && may_create) {
+        if (!CreateBtreeFile(path, options.info, access.mode))
+            return OpenCode(errno);
+        found = LookAtBtreeFile(path, access, file);
+    }
+    switch (found) {
     case BtreeFile::foreign:
-        return RemoveForeign(path);
+        return RemoveForeign(path, access.is_ours);
     case BtreeFile::unreadable:
         return OpenCode(errno);
     case BtreeFile::missing:
-        if (!may_create)
-            return ERR_FILE_NOT_FOUND;
-        if (!CreateBtreeFile(path, options.info, options.mode))
-            return OpenCode(errno);
-        break;
+        return ERR_FILE_NOT_FOUND;
     case BtreeFile::store:
         break;
     }
@@ -121,7 +141,22 @@ int Btree::Open(const char *path, const Options &options, std::unique_ptr<Btree>
     errno = 0;
     store->pDb = ::dbopen(path, options.flags & O_ACCMODE, 0, DB_BTREE, options.info ? &parameters : nullptr);
     if (!store->pDb)
-        return errno == EINVAL ? RemoveForeign(path) : OpenCode(errno);
+        return errno == EINVAL ? RemoveForeign(path, access.is_ours) : OpenCode(errno);
+    if (!IsSameFile(Handle(store.get()), file))
+        return ERR_OPEN_FAILED;
+    out = std::move(store);
+    return 0;
+}
+
+int Btree::Create(const char *path, std::unique_ptr<Btree> &out)
+{
+    const NoStoreSync no_sync;
+    std::unique_ptr<Btree> store(new Btree(path, false));
+    BTREEINFO parameters = {};
+    errno = 0;
+    store->pDb = ::dbopen(path, O_RDWR | O_CREAT, 0600, DB_BTREE, &parameters);
+    if (!store->pDb)
+        return OpenCode(errno);
     out = std::move(store);
     return 0;
 }
@@ -190,6 +225,12 @@ int Btree::Step(bool skip_reserved, std::string_view &key, std::string_view &val
         else if (flag == R_LAST)
             nCursorType = TAVO_BDB_CURSOR_PREV;
     }
+}
+
+int Btree::Walk(Entry which, std::string_view &key, std::string_view &value)
+{
+    nCursorType = which == Entry::kFirst ? TAVO_BDB_CURSOR_FIRST : TAVO_BDB_CURSOR_NEXT;
+    return Step(true, key, value);
 }
 
 int Btree::GetNumber(std::string_view key, int32_t &value) const

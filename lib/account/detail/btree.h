@@ -3,6 +3,7 @@
 #ifndef TAVO_ACCOUNT_DETAIL_BTREE_H
 #define TAVO_ACCOUNT_DETAIL_BTREE_H
 
+#include "account/detail/store_view.h"
 #include "tavo_bdb.h"
 
 #include <memory>
@@ -14,33 +15,36 @@
 
 namespace tavo {
 
-class Btree : public TAVOBDB {
+class Btree : public TAVOBDB, public StoreView {
   public:
-    // `mode` is given to a file that is created, and to any file when we are root; 0 leaves an existing file's alone.
+    // `mode` is given to a file that is created, and to any file when we are root; 0 leaves an existing file's alone. The
+    // stores of the families have modes of their own, and what is not root's alone there is no store.
     struct Options {
         int flags = 0;
         bool info = true;
         mode_t mode = 0;
     };
 
-    // 0 and a handle, or an error code. A file that is no store has been deleted with ERR_DB_OPEN.
+    // 0 and a handle, or an error code. A file that is no store is gone after ERR_DB_OPEN.
     static int Open(const char *path, const Options &options, std::unique_ptr<Btree> &out);
+
+    // A new store in a folder that nobody else can enter. The file's mode is 0600.
+    static int Create(const char *path, std::unique_ptr<Btree> &out);
 
     // The handle behind a caller's pointer: every TAVOBDB comes from Open.
     static Btree *Of(TAVOBDB *handle) { return static_cast<Btree *>(handle); }
     static const Btree *Of(const TAVOBDB *handle) { return static_cast<const Btree *>(handle); }
 
-    ~Btree();
-    Btree(const Btree &) = delete;
-    Btree &operator=(const Btree &) = delete;
+    ~Btree() override;
 
     // The views stay valid until the next call on this handle. Absent: ERR_KEY_NOT_FOUND.
-    int Get(std::string_view key, std::string_view &value) const;
+    int Get(std::string_view key, std::string_view &value) const override;
     int Set(std::string_view key, std::string_view value);
     int Delete(std::string_view key);
 
     // One step as nCursorType says; past the end: ERR_DB_END. `key` is read for TAVO_BDB_CURSOR_KEY.
     int Step(bool skip_reserved, std::string_view &key, std::string_view &value);
+    int Walk(Entry which, std::string_view &key, std::string_view &value) override;
 
     // A 32-bit value of a reserved key. ERR_DB_CURSOR when it is there but not four bytes long.
     int GetNumber(std::string_view key, int32_t &value) const;

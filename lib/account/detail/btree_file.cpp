@@ -39,44 +39,60 @@ bool IsWholeBtree(int fd, off_t size)
 // A directory of our own that goes away with what the database left in it.
 class BuildDir {
   public:
-    explicit BuildDir(const std::string &path) : path_(path + ".XXXXXX") { made_ = ::mkdtemp(path_.data()) != nullptr; }
+    explicit BuildDir(const std::string &path) : path_(path + ".XXXXXX")
+    {
+        file_.reserve(path_.size() + sizeof "/store");
+        left_over_.reserve(path_.size() + sizeof "/__db.store");
+        made_ = ::mkdtemp(path_.data()) != nullptr;
+        file_.append(path_).append("/store");
+        left_over_.append(path_).append("/__db.store");
+    }
     ~BuildDir()
     {
         KeepErrno keep;
         if (!made_)
             return;
-        ::unlink(File().c_str());
-        ::unlink((path_ + "/__db.store").c_str());
+        ::unlink(file_.c_str());
+        ::unlink(left_over_.c_str());
         ::rmdir(path_.c_str());
     }
     BuildDir(const BuildDir &) = delete;
     BuildDir &operator=(const BuildDir &) = delete;
 
     explicit operator bool() const { return made_; }
-    std::string File() const { return path_ + "/store"; }
+    const char *File() const { return file_.c_str(); }
 
   private:
     std::string path_;
+    std::string file_;       // composed beforehand: a destructor must not need memory
+    std::string left_over_;  // of a creation that failed
     bool made_ = false;
 };
 
+// Nobody but root can have written to it, and nobody who may not can read it.
+bool IsOurs(const struct stat &st, mode_t mode)
+{
+    return st.st_uid == 0 && st.st_nlink == 1 && (st.st_mode & 07777 & ~mode) == 0;
+}
+
 }  // namespace
 
-BtreeFile LookAtBtreeFile(const char *path, mode_t mode) noexcept
+BtreeFile LookAtBtreeFile(const char *path, const StoreAccess &access, StoreFile &file) noexcept
 {
     struct stat st;
     if (::lstat(path, &st) != 0)
         return errno == ENOENT ? BtreeFile::missing : BtreeFile::unreadable;
-    if (!S_ISREG(st.st_mode))
+    if (!S_ISREG(st.st_mode) || (access.is_ours && !IsOurs(st, access.mode)))
         return BtreeFile::foreign;
     const Fd fd = OpenFd(path, O_RDONLY | O_NOFOLLOW);
     if (!fd || ::fstat(fd.Get(), &st) != 0)
         return BtreeFile::unreadable;
-    if (!S_ISREG(st.st_mode) || !IsWholeBtree(fd.Get(), st.st_size))
+    if (!S_ISREG(st.st_mode) || (access.is_ours && !IsOurs(st, access.mode)) || !IsWholeBtree(fd.Get(), st.st_size))
         return BtreeFile::foreign;
     // Not when it has that mode already: setting it would change the time stamp by which the seal knows the file.
-    if (mode != 0 && ::geteuid() == 0 && (st.st_mode & 07777) != mode)
-        ::fchmod(fd.Get(), mode);
+    if (access.mode != 0 && ::geteuid() == 0 && (st.st_mode & 07777) != access.mode)
+        ::fchmod(fd.Get(), access.mode);
+    file = {st.st_dev, st.st_ino};
     return BtreeFile::store;
 }
 
@@ -87,15 +103,15 @@ bool CreateBtreeFile(const char *path, bool info, mode_t mode)
         return false;
     const NoStoreSync no_sync;
     BTREEINFO parameters = {};
-    DB *db = ::dbopen(dir.File().c_str(), O_RDWR | O_CREAT, 0600, DB_BTREE, info ? &parameters : nullptr);
+    DB *db = ::dbopen(dir.File(), O_RDWR | O_CREAT, 0600, DB_BTREE, info ? &parameters : nullptr);
     if (!db)
         return false;
-    const Fd fd = OpenFd(dir.File().c_str(), O_RDONLY | O_NOFOLLOW);
+    const Fd fd = OpenFd(dir.File(), O_RDONLY | O_NOFOLLOW);
     if (db->close(db) != 0 || !fd)
         return false;
     if (mode != 0 && ::fchmod(fd.Get(), mode) != 0)
         return false;
-    return ::link(dir.File().c_str(), path) == 0;  // not rename: what came there in between is not ours to replace
+    return ::link(dir.File(), path) == 0;  // not rename: what came there in between is not ours to replace
 }
 
 }  // namespace tavo

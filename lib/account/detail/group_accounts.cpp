@@ -49,22 +49,27 @@ TAVOGROUPDB GroupDb(const AccountSession &session)
     return {session.Store(kGroupNameStore), session.Store(kGidStore), session.Store(kDescStore)};
 }
 
-int ReadGroupLine(const TAVOGROUPDB &db, std::string_view key, GroupLine &line)
+int ReadGroupLine(const StoreView &names, std::string_view key, GroupLine &line)
 {
     std::string_view value;
-    const int code = Btree::Of(db.pName)->Get(key, value);
+    const int code = names.Get(key, value);
     if (code != 0)
         return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_GROUP} : code;
     return ParseGroupLine(value, line);
 }
 
-int FindGroupKey(const TAVOGROUPDB &db, int32_t gid, std::string &key)
+int ReadGroupLine(const TAVOGROUPDB &db, std::string_view key, GroupLine &line)
+{
+    return ReadGroupLine(*Btree::Of(db.pName), key, line);
+}
+
+int FindGroupKey(const AccountSession &session, int32_t gid, std::string &key)
 {
     const auto has_id = [](std::string_view text, int32_t id) {
         GroupLine line;
         return ParseGroupLine(text, line) == 0 && line.gid == id;
     };
-    const int code = FindKeyById(*Btree::Of(db.pGid), *Btree::Of(db.pName), gid, has_id, key);
+    const int code = FindKeyById(*session.View(kGidStore), *session.View(kGroupNameStore), gid, has_id, key);
     return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_GROUP} : code;
 }
 

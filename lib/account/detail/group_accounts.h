@@ -16,10 +16,11 @@ inline constexpr IdRange kGids{kCurrentGidKey, TAVO_GROUP_GID_MIN, TAVO_GROUP_GI
 TAVOGROUPDB GroupDb(const AccountSession &session);
 
 // ERR_NO_SUCH_GROUP; ERR_FORMAT_ERROR, ERR_INVALID_GROUPNAME, ERR_DB_CURSOR ...
+int ReadGroupLine(const StoreView &names, std::string_view key, GroupLine &line);
 int ReadGroupLine(const TAVOGROUPDB &db, std::string_view key, GroupLine &line);
 
 // The key of the group with this id: ERR_NO_SUCH_GROUP when there is none.
-int FindGroupKey(const TAVOGROUPDB &db, int32_t gid, std::string &key);
+int FindGroupKey(const AccountSession &session, int32_t gid, std::string &key);
 
 // A description that fits into its line. "" takes the description away.
 bool IsGroupDescription(std::string_view text);

@@ -30,12 +30,11 @@ int ListGroups(int flags, const KeyFilter &wanted, std::vector<std::string> &nam
     AccountSession session(kGroupKind);
     if (const int code = session.OpenToRead(std::array{size_t{kGroupNameStore}}))
         return code;
-    Btree &groups = *session.Store(kGroupNameStore);
+    StoreView &groups = *session.View(kGroupNameStore);
     std::string_view key;
     std::string_view value;
     int code;
-    for (groups.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = groups.Step(true, key, value)) == 0;
-         groups.nCursorType = TAVO_BDB_CURSOR_NEXT) {
+    for (Entry which = Entry::kFirst; (code = groups.Walk(which, key, value)) == 0; which = Entry::kNext) {
         GroupLine group;
         if (ParseGroupLine(value, group) != 0)
             continue;

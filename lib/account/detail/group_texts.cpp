@@ -86,19 +86,16 @@ std::vector<StoreEntries> GroupStoreEntries(std::string_view groups, std::string
     return entries.Take();
 }
 
-bool ReadGroupTexts(StoreContent &out)
-{
-    std::string texts[kGroupTexts];
-    int64_t times[kGroupTexts];
-    for (size_t i = 0; i < kGroupTexts; ++i)
-        if (!ReadTextFile(kGroupTextRows[i].path, texts[i], times[i]))
-            return false;
-    out.stores = GroupStoreEntries(texts[kGroupText], texts[kDescText]);
-    out.sync_times.assign(kGroupStores, times[kGroupText]);
-    out.sync_times[kDescStore] = times[kDescText];
-    return true;
-}
-
-constexpr AccountKind kGroupKind{kGroupFamily, TAVO_LOCK_GROUP, ReadGroupTexts};
+constexpr AccountKind kGroupKind{
+    .family = kGroupFamily,
+    .lock = TAVO_LOCK_GROUP,
+    .name_store = kGroupNameStore,
+    .id_store = kGidStore,
+    .key_size = kGroupKeySize,
+    .entries =
+        [](std::span<const std::string> texts) {
+            return GroupStoreEntries(texts[kGroupText], texts[kDescText]);
+        },
+};
 
 }  // namespace tavo

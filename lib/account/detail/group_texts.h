@@ -10,8 +10,6 @@ namespace tavo {
 // as they are. Lines that are no group are left out; of two groups with one id the first has the index.
 std::vector<StoreEntries> GroupStoreEntries(std::string_view groups, std::string_view descriptions);
 
-bool ReadGroupTexts(StoreContent &out);
-
 extern const AccountKind kGroupKind;
 
 }  // namespace tavo

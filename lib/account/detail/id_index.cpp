@@ -37,7 +37,7 @@ bool HasIndex(Btree &index, int32_t id, std::string_view key)
     return index.Get(IdKey(id), owner) == 0 && owner == key;
 }
 
-int FindKeyById(Btree &index, Btree &names, int32_t id, bool (*has_id)(std::string_view line, int32_t id),
+int FindKeyById(const StoreView &index, StoreView &names, int32_t id, bool (*has_id)(std::string_view line, int32_t id),
                 std::string &key)
 {
     std::string_view owner;
@@ -47,8 +47,7 @@ int FindKeyById(Btree &index, Btree &names, int32_t id, bool (*has_id)(std::stri
         return 0;
     }
     int code;
-    for (names.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = names.Step(true, owner, line)) == 0;
-         names.nCursorType = TAVO_BDB_CURSOR_NEXT) {
+    for (Entry which = Entry::kFirst; (code = names.Walk(which, owner, line)) == 0; which = Entry::kNext) {
         if (has_id(line, id)) {
             key = owner;
             return 0;

@@ -14,7 +14,7 @@ bool HasIndex(Btree &index, int32_t id, std::string_view key);
 
 // The key of the account with that id, also of one that shares it with another or has lost its entry with that one. 0,
 // ERR_KEY_NOT_FOUND or a code of the stores.
-int FindKeyById(Btree &index, Btree &names, int32_t id, bool (*has_id)(std::string_view line, int32_t id),
+int FindKeyById(const StoreView &index, StoreView &names, int32_t id, bool (*has_id)(std::string_view line, int32_t id),
                 std::string &key);
 
 struct IdRange {

@@ -42,16 +42,14 @@ int CollectAccounts(Btree &index, Btree &names, const AccountLines &lines, Accou
     std::string_view key;
     std::string_view value;
     int code;
-    for (index.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = index.Step(true, key, value)) == 0;
-         index.nCursorType = TAVO_BDB_CURSOR_NEXT) {
+    for (Entry which = Entry::kFirst; (code = index.Walk(which, key, value)) == 0; which = Entry::kNext) {
         std::string_view line;
         if (names.Get(value, line) == 0 && (code = AddAccount(value, line, lines, keys, accounts)) != 0)
             return code;
     }
     if (code != ERR_DB_END)
         return code;
-    for (names.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = names.Step(true, key, value)) == 0;
-         names.nCursorType = TAVO_BDB_CURSOR_NEXT)
+    for (Entry which = Entry::kFirst; (code = names.Walk(which, key, value)) == 0; which = Entry::kNext)
         if ((code = AddAccount(key, value, lines, keys, accounts)) != 0)
             return code;
     std::stable_sort(accounts.begin(), accounts.end(),

@@ -1,22 +1,40 @@
 // Finds the user that a quota is about.
 #include "account/detail/quota_user.h"
 
+#include "account/detail/account_name.h"
+#include "account/detail/account_session.h"
 #include "account/detail/group_owner.h"
-#include "account/detail/user_owner.h"
+#include "account/detail/user_accounts.h"
+#include "account/detail/user_texts.h"
 #include "core/detail/keep_fault.h"
 
+#include <array>
+
 namespace tavo {
+namespace {
+
+// Not the whole record: programs that are not root have quotas, too, and no business with hashes.
+int FindUid(const char *name, int32_t &uid)
+{
+    const std::optional<std::string> key = AccountKey(name);
+    if (!key)
+        return ERR_NO_SUCH_USER;
+    AccountSession session(kUserKind);
+    if (const int code = session.OpenToRead(std::array{size_t{kNameStore}}))
+        return code;
+    PasswdLine line;
+    const int code = ReadPasswdLine(*session.View(kNameStore), *key, line);
+    uid = line.uid;
+    return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
+}
+
+}  // namespace
 
 int FindQuotaUser(const char *name, int32_t &uid)
 {
     const KeepFault keep;
-    UserOwner user;
-    if (TAVOUserGet(name, user.Fill()) == 0) {
-        uid = user->nUid;
-        return 0;
-    }
-    const int code = tavoerrno;
-    if (code != ERR_NO_SUCH_USER && code != ERR_INVALID_USERNAME)
+    const int code = FindUid(name, uid);
+    if (code != ERR_NO_SUCH_USER)
         return code;
     // Groups have no quotas, whichever way they are spelled in lists of names.
     GroupOwner group;

@@ -2,40 +2,108 @@
 #include "account/detail/store_build.h"
 
 #include "account/detail/btree.h"
-#include "account/detail/btree_file.h"
-#include "account/detail/store_mode.h"
+#include "account/detail/free_name.h"
 #include "account/detail/store_seal.h"
 #include "account/detail/text_commit.h"
+#include "core/detail/owner.h"
 #include "tavo_error.h"
 
+#include <cstring>
 #include <filesystem>
 
+#include <dirent.h>
 #include <fcntl.h>
 #include <sys/stat.h>
-#include <unistd.h>
 
 namespace tavo {
 namespace {
 
-namespace fs = std::filesystem;
-
-std::string NameOf(const char *path)
+// False when a text file is there but cannot be read.
+bool ReadContent(const AccountKind &kind, StoreContent &out)
 {
-    return fs::path(path).filename();
+    const StoreFamily &family = kind.family;
+    std::vector<std::string> texts(family.texts.size());
+    out.sync_times.resize(family.stores.size());
+    for (size_t i = 0; i < texts.size(); ++i) {
+        int64_t time = 0;
+        if (!ReadTextFile(family.texts[i].path, texts[i], time))
+            return false;
+        for (size_t store = 0; store < family.stores.size(); ++store)
+            if (std::strcmp(family.stores[store].text, family.texts[i].path) == 0)
+                out.sync_times[store] = time;
+    }
+    out.stores = kind.entries(texts);
+    return true;
 }
 
-// An empty directory that is ours alone. What stands there instead is removed, links without being followed.
-bool MakeBuildDir(const char *path)
+struct CloseFolder {
+    void operator()(DIR *folder) const noexcept { ::closedir(folder); }
+};
+
+// Root's folders of the mode that mkdtemp gives, in which stores were built by those who died over it. Somebody may
+// have filled /tmp, so the search ends somewhere.
+void RemoveLeftFolders(const StoreFamily &family)
 {
-    std::error_code ignored;
-    fs::remove_all(path, ignored);
-    return ::mkdir(path, 0700) == 0;
+    constexpr int most = 4096;
+    const std::unique_ptr<DIR, CloseFolder> tmp(::opendir("/tmp"));
+    const std::string prefix = std::string(family.prefix).substr(sizeof "/tmp") + "tmp.";
+    const dirent *entry = nullptr;
+    for (int i = 0; i < most && tmp && (entry = ::readdir(tmp.get())); ++i) {
+        struct stat st;
+        if (!std::string_view(entry->d_name).starts_with(prefix) ||
+            ::fstatat(::dirfd(tmp.get()), entry->d_name, &st, AT_SYMLINK_NOFOLLOW) != 0 || st.st_uid != 0 ||
+            (st.st_mode & (S_IFMT | 07777)) != (S_IFDIR | 0700))
+            continue;
+        std::error_code ignored;
+        std::filesystem::remove_all(std::filesystem::path("/tmp") / entry->d_name, ignored);
+    }
 }
 
-int FillStore(const std::string &path, const StoreEntries &entries, int64_t sync_time)
+// A folder of our own in which nobody else can put anything, gone with what is in it.
+class BuildFolder {
+  public:
+    explicit BuildFolder(const StoreFamily &family) : path_(std::string(family.prefix) + "tmp.XXXXXX")
+    {
+        for (const StoreRow &row : family.stores) {
+            const std::string_view name = NameOf(row);
+            files_.push_back(path_ + '/' + std::string(name));
+            files_.push_back(path_ + "/__db." + std::string(name));  // of a creation that failed
+        }
+        made_ = ::mkdtemp(path_.data()) != nullptr;
+        for (std::string &file : files_)
+            file.replace(0, path_.size(), path_);
+    }
+    ~BuildFolder()
+    {
+        const KeepErrno keep;
+        if (!made_)
+            return;
+        for (const std::string &file : files_)
+            ::unlink(file.c_str());
+        ::rmdir(path_.c_str());
+    }
+    BuildFolder(const BuildFolder &) = delete;
+    BuildFolder &operator=(const BuildFolder &) = delete;
+
+    explicit operator bool() const { return made_; }
+    const char *File(size_t store) const { return files_[2 * store].c_str(); }
+
+  private:
+    static std::string_view NameOf(const StoreRow &row)
+    {
+        const std::string_view path = row.path;
+        return path.substr(path.rfind('/') + 1);
+    }
+
+    std::string path_;
+    std::vector<std::string> files_;  // composed beforehand: a destructor must not need memory
+    bool made_ = false;
+};
+
+int FillStore(const char *path, const StoreEntries &entries, int64_t sync_time)
 {
     std::unique_ptr<Btree> store;
-    if (const int code = Btree::Open(path.c_str(), {O_RDWR | O_CREAT, true, StoreMode()}, store))
+    if (const int code = Btree::Create(path, store))
         return code;
     for (const auto &[key, value] : entries)
         if (const int code = store->Set(key, value))
@@ -48,18 +116,23 @@ int FillStore(const std::string &path, const StoreEntries &entries, int64_t sync
     return code != 0 ? code : store->Close();
 }
 
-bool MoveIntoPlace(const std::string &built, const char *path)
+// The one that stood there is kept for a look at what went wrong, unless it held secrets or was not ours.
+void SetAside(const StoreRow &row)
 {
-    std::error_code ignored;
+    const std::string backup = std::string(row.path) + ".bak";
     struct stat st;
-    if (::lstat(path, &st) == 0) {
-        const std::string backup = std::string(path) + ".bak";
-        const bool ours = S_ISREG(st.st_mode) && st.st_uid == ::geteuid() && st.st_nlink == 1;
-        fs::remove_all(ours ? fs::path(backup) : fs::path(path), ignored);
-        if (ours)
-            ::rename(path, backup.c_str());
-    }
-    return ::rename(built.c_str(), path) == 0;
+    FreeName(backup.c_str());
+    if (::lstat(row.path, &st) == 0 && S_ISREG(st.st_mode) && st.st_uid == 0 && st.st_nlink == 1 &&
+        row.mode != kSecretStore && ::chmod(row.path, 0600) == 0)
+        ::rename(row.path, backup.c_str());
+}
+
+bool MoveIntoPlace(const char *built, const StoreRow &row)
+{
+    if (::chmod(built, row.mode) != 0)
+        return false;
+    SetAside(row);
+    return ::rename(built, row.path) == 0 || (FreeName(row.path) && ::rename(built, row.path) == 0);
 }
 
 }  // namespace
@@ -72,22 +145,21 @@ int BuildStores(const AccountKind &kind, std::string &texts)
         return code;
     texts = StampTexts(family);
     StoreContent content;
-    if (!kind.read(content))
+    if (!ReadContent(kind, content))
         return ERR_READ_FAILED;
-    if (!MakeBuildDir(family.build_dir))
-        return ERR_OPEN_FAILED;
-    const std::string dir = std::string(family.build_dir) + '/';
+    RemoveLeftFolders(family);
+    const BuildFolder folder(family);
+    if (!folder)
+        return errno == ENOSPC ? int{ERR_NOT_ENOUGH_SPACE} : int{ERR_OPEN_FAILED};
     int code = 0;
     for (size_t i = 0; i < family.stores.size() && code == 0; ++i)
-        code = FillStore(dir + NameOf(family.stores[i].path), content.stores[i], content.sync_times[i]);
+        code = FillStore(folder.File(i), content.stores[i], content.sync_times[i]);
     for (size_t i = 0; i < family.stores.size() && code == 0; ++i)
-        if (!MoveIntoPlace(dir + NameOf(family.stores[i].path), family.stores[i].path))
+        if (!MoveIntoPlace(folder.File(i), family.stores[i]))
             code = ERR_OPEN_FAILED;
-    std::error_code ignored;
-    fs::remove_all(family.build_dir, ignored);
     if (code == 0)
         WriteSeal(family, texts);
-    return code == ERR_NOT_ENOUGH_SPACE ? code : code == 0 ? 0 : ERR_OPEN_FAILED;
+    return code == ERR_NOT_ENOUGH_SPACE || code == ERR_OUT_OF_MEMORY ? code : code == 0 ? 0 : int{ERR_OPEN_FAILED};
 }
 
 }  // namespace tavo

@@ -10,14 +10,17 @@ namespace tavo {
 // An account family as the session needs to know it.
 struct AccountKind {
     const StoreFamily &family;
-    unsigned lock;                    // the lock that guards its stores and text files
-    bool (*read)(StoreContent &out);  // reads the text files; false when one is there but cannot be read
+    unsigned lock;      // the lock that guards its stores and text files
+    size_t name_store;  // the places of two of its stores: that of the accounts, and the index by id
+    size_t id_store;
+    size_t key_size;
+    std::vector<StoreEntries> (*entries)(std::span<const std::string> texts);  // what the text files make of the stores
 };
 
 // Completes a half-done commit, reads the text files and puts new stores in place of the old ones, whatever those are;
-// old ones that were stores are kept as "NAME.bak". The locks must be held exclusively.
+// old ones that were root's and hold no secrets are kept as "NAME.bak". The locks must be held exclusively.
 // `texts` becomes what the text files looked like when they were read.
-// 0, ERR_OPEN_FAILED, ERR_READ_FAILED, ERR_NOT_ENOUGH_SPACE or ERR_RENAME_FAILED.
+// 0, ERR_OPEN_FAILED, ERR_READ_FAILED, ERR_NOT_ENOUGH_SPACE, ERR_OUT_OF_MEMORY or ERR_RENAME_FAILED.
 int BuildStores(const AccountKind &kind, std::string &texts);
 
 }  // namespace tavo

@@ -10,9 +10,14 @@
 
 namespace tavo {
 
+// Stores belong to root: what others may write is never read back as truth, and hashes are nobody else's business.
+inline constexpr unsigned kPublicStore = 0644;
+inline constexpr unsigned kSecretStore = 0600;
+
 struct StoreRow {
     const char *path;  // the store
     const char *text;  // whose modification time is the store's sync time
+    unsigned mode;     // kPublicStore or kSecretStore
 };
 
 struct TextRow {
@@ -24,7 +29,6 @@ struct TextRow {
 struct StoreFamily {
     const char *prefix;     // what the names of all store files of the family begin with
     const char *seal;       // the record that the stores match the text files
-    const char *build_dir;  // where new stores are built
     const char *marker;  // stands while text files are being moved into place: not under /tmp, it must outlive a reboot
     std::span<const StoreRow> stores;
     std::span<const TextRow> texts;  // in the order in which they are moved into place
@@ -41,14 +45,14 @@ inline constexpr std::array<TextRow, kUserTexts> kUserTextRows{{
     {"/etc/tavouser.conf", "/etc/tavouser.conf.tmp", 0644},
 }};
 inline constexpr std::array<StoreRow, kUserStores> kUserStoreRows{{
-    {TAVO_USER_DB_NAME, kUserTextRows[kPasswdText].path},
-    {TAVO_USER_DB_MISC, kUserTextRows[kMiscText].path},
-    {TAVO_USER_DB_SHADOW, kUserTextRows[kShadowText].path},
-    {TAVO_USER_DB_SMB, kUserTextRows[kSmbText].path},
-    {TAVO_USER_DB_UID, kUserTextRows[kPasswdText].path},
+    {TAVO_USER_DB_NAME, kUserTextRows[kPasswdText].path, kPublicStore},
+    {TAVO_USER_DB_MISC, kUserTextRows[kMiscText].path, kPublicStore},
+    {TAVO_USER_DB_SHADOW, kUserTextRows[kShadowText].path, kSecretStore},
+    {TAVO_USER_DB_SMB, kUserTextRows[kSmbText].path, kSecretStore},
+    {TAVO_USER_DB_UID, kUserTextRows[kPasswdText].path, kPublicStore},
 }};
 inline constexpr StoreFamily kUserFamily{
-    "/tmp/.db.user.", "/tmp/.db.user.seal", "/tmp/.db.user.tmp", "/etc/.tavouser.commit", kUserStoreRows, kUserTextRows,
+    "/tmp/.db.user.", "/tmp/.db.user.seal", "/etc/.tavouser.commit", kUserStoreRows, kUserTextRows,
 };
 
 // The same of the group family.
@@ -60,13 +64,12 @@ inline constexpr std::array<TextRow, kGroupTexts> kGroupTextRows{{
     {"/etc/group_desc", "/etc/group_desc.tmp", 0644},
 }};
 inline constexpr std::array<StoreRow, kGroupStores> kGroupStoreRows{{
-    {TAVO_GROUP_DB_NAME, kGroupTextRows[kGroupText].path},
-    {TAVO_GROUP_DB_ID, kGroupTextRows[kGroupText].path},
-    {TAVO_GROUP_DB_DESC, kGroupTextRows[kDescText].path},
+    {TAVO_GROUP_DB_NAME, kGroupTextRows[kGroupText].path, kPublicStore},
+    {TAVO_GROUP_DB_ID, kGroupTextRows[kGroupText].path, kPublicStore},
+    {TAVO_GROUP_DB_DESC, kGroupTextRows[kDescText].path, kPublicStore},
 }};
 inline constexpr StoreFamily kGroupFamily{
-    "/tmp/.db.group.",        "/tmp/.db.group.seal", "/tmp/.db.group.tmp",
-    "/etc/.tavogroup.commit", kGroupStoreRows,       kGroupTextRows,
+    "/tmp/.db.group.", "/tmp/.db.group.seal", "/etc/.tavogroup.commit", kGroupStoreRows, kGroupTextRows,
 };
 
 }  // namespace tavo

@@ -1,7 +1,9 @@
 // Makes, checks and breaks the seal on the stores of a family.
 #include "account/detail/store_seal.h"
 
+#include "account/detail/free_name.h"
 #include "core/detail/open_file.h"
+#include "core/detail/temp_file.h"
 
 #include <cinttypes>
 #include <cstring>
@@ -64,8 +66,7 @@ bool SealHolds(const StoreFamily &family)
 {
     const Fd fd = OpenFd(family.seal, O_RDONLY | O_NOFOLLOW);
     struct stat st;
-    if (!fd || ::fstat(fd.Get(), &st) != 0 || !S_ISREG(st.st_mode) || (st.st_mode & 022) != 0 ||
-        (st.st_uid != 0 && st.st_uid != ::geteuid()))
+    if (!fd || ::fstat(fd.Get(), &st) != 0 || !S_ISREG(st.st_mode) || (st.st_mode & 022) != 0 || st.st_uid != 0)
         return false;
     const std::string sealed = ReadSmall(fd);
     return !sealed.empty() && sealed == SealText(family, StampTexts(family));
@@ -73,8 +74,7 @@ bool SealHolds(const StoreFamily &family)
 
 void BreakSeal(const StoreFamily &family) noexcept
 {
-    if (::unlink(family.seal) != 0 && errno == EISDIR)
-        ::rmdir(family.seal);
+    FreeName(family.seal);
 }
 
 std::string StampTexts(const StoreFamily &family) noexcept
@@ -95,9 +95,12 @@ try {
     const std::string text = SealText(family, texts);
     if (text.empty())
         return;
-    const Fd fd = OpenFd(family.seal, O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, 0644);
-    if (!fd || ::fchmod(fd.Get(), 0644) != 0 || !WriteAll(fd.Get(), text))
-        BreakSeal(family);
+    TempFile seal;  // under a name that nobody can take first
+    if (!seal.CreateBeside(family.seal) || !WriteAll(seal.Descriptor(), text))
+        return;
+    const std::string path = family.seal;
+    if (!seal.RenameTo(path) && FreeName(family.seal))
+        seal.RenameTo(path);
 } catch (const std::bad_alloc &) {
 }
 
@@ -108,6 +111,15 @@ const StoreFamily *FamilyOfStore(const char *path) noexcept
             if (std::strcmp(store.path, path) == 0)
                 return family;
     return nullptr;
+}
+
+unsigned ModeOfStore(const char *path) noexcept
+{
+    for (const StoreFamily *family : {&kUserFamily, &kGroupFamily})
+        for (const StoreRow &store : family->stores)
+            if (std::strcmp(store.path, path) == 0)
+                return store.mode;
+    return 0;
 }
 
 }  // namespace tavo

@@ -27,6 +27,9 @@ void WriteSeal(const StoreFamily &family, const std::string &texts) noexcept;
 // The family that a store file belongs to; nullptr for any other path.
 const StoreFamily *FamilyOfStore(const char *path) noexcept;
 
+// The mode of one of the stores of the families; 0 for any other path.
+unsigned ModeOfStore(const char *path) noexcept;
+
 }  // namespace tavo
 
 #endif

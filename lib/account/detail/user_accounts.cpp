@@ -15,10 +15,10 @@ constexpr std::string_view kLocked = "*";  // the hash of an account without a s
 
 // An absent line leaves the record as it is.
 template <class Line>
-int ReadOptional(TAVOBDB *store, std::string_view key, int (*parse)(std::string_view, Line &), Line &line)
+int ReadOptional(const StoreView &store, std::string_view key, int (*parse)(std::string_view, Line &), Line &line)
 {
     std::string_view value;
-    const int code = Btree::Of(store)->Get(key, value);
+    const int code = store.Get(key, value);
     return code == 0 ? parse(value, line) : code == ERR_KEY_NOT_FOUND ? 0 : code;
 }
 
@@ -47,24 +47,29 @@ bool IsReservedKey(std::string_view key)
     return key == WithNul("ROOT") || key == WithNul("ADMIN");
 }
 
-int ReadPasswdLine(const TAVOUSERDB &db, std::string_view key, PasswdLine &line)
+int ReadPasswdLine(const StoreView &names, std::string_view key, PasswdLine &line)
 {
     std::string_view value;
-    const int code = Btree::Of(db.pName)->Get(key, value);
+    const int code = names.Get(key, value);
     return code == 0 ? ParsePasswdLine(value, line) : code;
 }
 
-int ReadUser(const TAVOUSERDB &db, std::string_view key, TAVOUSER **user)
+int ReadPasswdLine(const TAVOUSERDB &db, std::string_view key, PasswdLine &line)
+{
+    return ReadPasswdLine(*Btree::Of(db.pName), key, line);
+}
+
+int ReadUser(const AccountSession &session, std::string_view key, TAVOUSER **user)
 {
     PasswdLine passwd;
     ShadowLine shadow;
     MiscLine misc;
     shadow.hash = kLocked;
-    int code = ReadPasswdLine(db, key, passwd);
+    int code = ReadPasswdLine(*session.View(kNameStore), key, passwd);
     if (code != 0)
         return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
-    if ((code = ReadOptional(db.pShadow, key, ParseShadowLine, shadow)) != 0 ||
-        (code = ReadOptional(db.pMisc, key, ParseMiscLine, misc)) != 0)
+    if ((code = ReadOptional(*session.View(kShadowStore), key, ParseShadowLine, shadow)) != 0 ||
+        (code = ReadOptional(*session.View(kMiscStore), key, ParseMiscLine, misc)) != 0)
         return code;
     if (TAVOUserAlloc(user, passwd.name.c_str(), shadow.hash.c_str(), passwd.uid, passwd.gid,
                       passwd.description.c_str(), passwd.home.c_str(), passwd.shell.c_str(), shadow.expire,
@@ -73,13 +78,26 @@ int ReadUser(const TAVOUSERDB &db, std::string_view key, TAVOUSER **user)
     return 0;
 }
 
-int FindUserKey(const TAVOUSERDB &db, int32_t uid, std::string &key)
+int ReadPrivilege(const AccountSession &session, std::string_view key, int32_t &privilege)
+{
+    PasswdLine passwd;
+    MiscLine misc;
+    int code = ReadPasswdLine(*session.View(kNameStore), key, passwd);
+    if (code == 0)
+        code = ReadOptional(*session.View(kMiscStore), key, ParseMiscLine, misc);
+    if (code != 0)
+        return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
+    privilege = Privilege(key, misc);
+    return 0;
+}
+
+int FindUserKey(const AccountSession &session, int32_t uid, std::string &key)
 {
     const auto has_id = [](std::string_view text, int32_t id) {
         PasswdLine line;
         return ParsePasswdLine(text, line) == 0 && line.uid == id;
     };
-    const int code = FindKeyById(*Btree::Of(db.pUid), *Btree::Of(db.pName), uid, has_id, key);
+    const int code = FindKeyById(*session.View(kUidStore), *session.View(kNameStore), uid, has_id, key);
     return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
 }
 

@@ -3,6 +3,8 @@
 #define TAVO_ACCOUNT_DETAIL_USER_ACCOUNTS_H
 
 #include "account/detail/passwd_line.h"
+#include "account/detail/password_hash.h"
+#include "account/detail/store_view.h"
 #include "tavo_user.h"
 
 #include <ctime>
@@ -20,13 +22,17 @@ inline constexpr char kDefaultShell[] = "/bin/csh";
 TAVOUSERDB UserDb(const AccountSession &session);
 
 // 0, ERR_KEY_NOT_FOUND, ERR_FORMAT_ERROR, ERR_INVALID_USERNAME, ERR_DB_CURSOR ...
+int ReadPasswdLine(const StoreView &names, std::string_view key, PasswdLine &line);
 int ReadPasswdLine(const TAVOUSERDB &db, std::string_view key, PasswdLine &line);
 
 // Fills a record from the stores name, shadow and misc. ERR_NO_SUCH_USER; codes of TAVOUserAlloc.
-int ReadUser(const TAVOUSERDB &db, std::string_view key, TAVOUSER **user);
+int ReadUser(const AccountSession &session, std::string_view key, TAVOUSER **user);
+
+// The privilege bits by the stores name and misc: what a record says. ERR_NO_SUCH_USER.
+int ReadPrivilege(const AccountSession &session, std::string_view key, int32_t &privilege);
 
 // The key of the account with this user id: ERR_NO_SUCH_USER when there is none.
-int FindUserKey(const TAVOUSERDB &db, int32_t uid, std::string &key);
+int FindUserKey(const AccountSession &session, int32_t uid, std::string &key);
 
 // What is about to be stored for one account, complete: storing it cannot be refused any more.
 struct UserChange {
@@ -44,8 +50,15 @@ struct UserChange {
     std::string smb_line;
 };
 
+// How a new password is hashed.
+struct Hashing {
+    time_t now = 0;
+    HashMethod method = HashMethod::kMd5;
+};
+
 // Refuses with one of the codes of TAVOUserSet's entries; changes nothing.
-int PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user, time_t now, UserChange &change);
+int PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user, const Hashing &hashing,
+                UserChange &change);
 
 // Fails only when a store cannot be changed; then the stores are no longer to be trusted.
 int StoreUser(const TAVOUSERDB &db, const UserChange &change);

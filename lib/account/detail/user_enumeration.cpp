@@ -63,12 +63,11 @@ int ListUsers(int flags, const KeyFilter &wanted, std::vector<std::string> &name
     if (const int code = session.OpenToRead(std::array{size_t{kNameStore}}))
         return code;
     const bool guest_is_supported = SettingIsYes(kFactorySettings, "supportguest");
-    Btree &accounts = *session.Store(kNameStore);
+    StoreView &accounts = *session.View(kNameStore);
     std::string_view key;
     std::string_view value;
     int code;
-    for (accounts.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = accounts.Step(true, key, value)) == 0;
-         accounts.nCursorType = TAVO_BDB_CURSOR_NEXT) {
+    for (Entry which = Entry::kFirst; (code = accounts.Walk(which, key, value)) == 0; which = Entry::kNext) {
         PasswdLine account;
         if (ParsePasswdLine(value, account) != 0)
             continue;

@@ -118,22 +118,19 @@ std::vector<StoreEntries> UserStoreEntries(const UserTexts &texts)
     return entries.Take();
 }
 
-bool ReadUserTexts(StoreContent &out)
-{
-    std::string texts[kUserTexts];
-    int64_t times[kUserTexts];
-    for (size_t i = 0; i < kUserTexts; ++i)
-        if (!ReadTextFile(kUserTextRows[i].path, texts[i], times[i]))
-            return false;
-    out.stores = UserStoreEntries(
-        {.passwd = texts[kPasswdText], .shadow = texts[kShadowText], .misc = texts[kMiscText], .smb = texts[kSmbText]});
-    out.sync_times.assign(kUserStores, times[kPasswdText]);
-    out.sync_times[kMiscStore] = times[kMiscText];
-    out.sync_times[kShadowStore] = times[kShadowText];
-    out.sync_times[kSmbStore] = times[kSmbText];
-    return true;
-}
-
-constexpr AccountKind kUserKind{kUserFamily, TAVO_LOCK_USER, ReadUserTexts};
+constexpr AccountKind kUserKind{
+    .family = kUserFamily,
+    .lock = TAVO_LOCK_USER,
+    .name_store = kNameStore,
+    .id_store = kUidStore,
+    .key_size = kUserKeySize,
+    .entries =
+        [](std::span<const std::string> texts) {
+            return UserStoreEntries({.passwd = texts[kPasswdText],
+                                     .shadow = texts[kShadowText],
+                                     .misc = texts[kMiscText],
+                                     .smb = texts[kSmbText]});
+        },
+};
 
 }  // namespace tavo

@@ -19,8 +19,6 @@ struct UserTexts {
 // as they are. Lines that are no account are left out; of two accounts with one user id the first has the index.
 std::vector<StoreEntries> UserStoreEntries(const UserTexts &texts);
 
-bool ReadUserTexts(StoreContent &out);
-
 extern const AccountKind kUserKind;
 
 }  // namespace tavo

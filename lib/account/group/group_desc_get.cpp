@@ -23,10 +23,10 @@ extern "C" int TAVOGroupDescGet(const char *szName, char *szBuf, int cbBuf)
         if (const int code = session.OpenToRead(stores))
             return Fail(code);
         tavo::GroupLine group;
-        if (const int code = tavo::ReadGroupLine(tavo::GroupDb(session), *key, group))
+        if (const int code = tavo::ReadGroupLine(*session.View(tavo::kGroupNameStore), *key, group))
             return Fail(code);
         std::string_view line;
-        const int code = session.Store(tavo::kDescStore)->Get(*key, line);
+        const int code = session.View(tavo::kDescStore)->Get(*key, line);
         if (code != 0 && code != ERR_KEY_NOT_FOUND)
             return Fail(code);
         const std::string text(code == 0 ? tavo::GroupDescription(line) : std::string_view());

@@ -22,7 +22,7 @@ extern "C" int TAVOGroupGet(const char *szName, TAVOGROUP **ppGroup)
         if (const int code = session.OpenToRead(std::array{size_t{tavo::kGroupNameStore}}))
             return Fail(code);
         std::string_view line;
-        if (const int code = session.Store(tavo::kGroupNameStore)->Get(*key, line))
+        if (const int code = session.View(tavo::kGroupNameStore)->Get(*key, line))
             return Fail(code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_GROUP} : code);
         return TAVOGroupAlloc(ppGroup, std::string(line).c_str()) == 0 ? 0 : Fail(tavoerrno);
     });

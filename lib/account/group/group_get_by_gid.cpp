@@ -19,9 +19,9 @@ extern "C" int TAVOGroupGetByGID(int gid, TAVOGROUP **ppGroup)
             return Fail(code);
         std::string key;
         std::string_view line;
-        int code = tavo::FindGroupKey(tavo::GroupDb(session), gid, key);
+        int code = tavo::FindGroupKey(session, gid, key);
         if (code == 0)
-            code = session.Store(tavo::kGroupNameStore)->Get(key, line);
+            code = session.View(tavo::kGroupNameStore)->Get(key, line);
         if (code != 0)
             return Fail(code);
         return TAVOGroupAlloc(ppGroup, std::string(line).c_str()) == 0 ? 0 : Fail(tavoerrno);

@@ -33,8 +33,8 @@ int Collect(tavo::Btree &groups, const TLIBSZHASH *names, std::vector<std::pair<
     std::string_view key;
     std::string_view value;
     int code;
-    for (groups.nCursorType = TAVO_BDB_CURSOR_FIRST; (code = groups.Step(true, key, value)) == 0;
-         groups.nCursorType = TAVO_BDB_CURSOR_NEXT) {
+    for (tavo::Entry which = tavo::Entry::kFirst; (code = groups.Walk(which, key, value)) == 0;
+         which = tavo::Entry::kNext) {
         tavo::GroupLine group;
         if (tavo::ParseGroupLine(value, group) == 0 && ChangeMembers(names, group))
             lines.emplace_back(key, tavo::FormatGroupLine(group).append(1, '\0'));

@@ -23,7 +23,7 @@ extern "C" int TAVOUserGet(const char *szName, TAVOUSER **ppUser)
         constexpr std::array stores{size_t{tavo::kNameStore}, size_t{tavo::kShadowStore}, size_t{tavo::kMiscStore}};
         if (const int code = session.OpenToRead(stores))
             return Fail(code);
-        const int code = tavo::ReadUser(tavo::UserDb(session), *key, ppUser);
+        const int code = tavo::ReadUser(session, *key, ppUser);
         return code == 0 ? 0 : Fail(code);
     });
 }

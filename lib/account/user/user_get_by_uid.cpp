@@ -19,9 +19,9 @@ extern "C" int TAVOUserGetByUID(int uid, TAVOUSER **ppUser)
         if (const int code = session.OpenToRead(stores))
             return Fail(code);
         std::string key;
-        int code = tavo::FindUserKey(tavo::UserDb(session), uid, key);
+        int code = tavo::FindUserKey(session, uid, key);
         if (code == 0)
-            code = tavo::ReadUser(tavo::UserDb(session), key, ppUser);
+            code = tavo::ReadUser(session, key, ppUser);
         return code == 0 ? 0 : Fail(code);
     });
 }

@@ -21,7 +21,7 @@ extern "C" int TAVOUserGetValidUserList(const char *const *rgszName, char *szBuf
         for (; *rgszName; ++rgszName) {
             const std::optional<std::string> key = tavo::AccountKey(*rgszName);
             std::string_view line;
-            if (**rgszName && key && session.Store(tavo::kNameStore)->Get(*key, line) == 0)
+            if (**rgszName && key && session.View(tavo::kNameStore)->Get(*key, line) == 0)
                 valid.append(valid.empty() ? "" : ",").append(*rgszName);
         }
         const size_t length = valid.size() + 1;

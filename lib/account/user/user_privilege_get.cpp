@@ -1,16 +1,30 @@
-// Tells the application privilege bits of an account.
+// Looks up the application privilege bits of an account.
 #include "tavo_user.h"
 
-#include "account/detail/user_owner.h"
+#include "account/detail/account_name.h"
+#include "account/detail/account_session.h"
+#include "account/detail/user_accounts.h"
+#include "account/detail/user_texts.h"
+#include "core/detail/guard.h"
 
-#include <strings.h>
+#include <array>
 
 extern "C" int TAVOUserPrivilegeGet(const char *szName)
 {
-    tavo::UserOwner user;
-    if (TAVOUserGet(szName, user.Fill()) != 0)
-        return -1;
-    if (user->nKind == TAVO_USER_KIND_DOMAIN)
-        return TAVO_USER_PRIVILEGE_DOMAIN;
-    return ::strcasecmp(user->szName, "guest") == 0 ? 0 : user->nPrivilege;
+    if (!szName || !*szName)
+        return Fail(ERR_BAD_PARAMETERS);
+    return Guard([&] {
+        const std::optional<std::string> key = tavo::AccountKey(szName);
+        if (!key)
+            return Fail(ERR_INVALID_USERNAME);
+        tavo::AccountSession session(tavo::kUserKind);
+        if (const int code = session.OpenToRead(std::array{size_t{tavo::kNameStore}, size_t{tavo::kMiscStore}}))
+            return Fail(code);
+        int32_t privilege = 0;
+        if (const int code = tavo::ReadPrivilege(session, *key, privilege))
+            return Fail(code);
+        return tavo::IsDomainName(szName) ? int{TAVO_USER_PRIVILEGE_DOMAIN}
+               : *key == tavo::WithNul("GUEST") ? 0
+                                                : int{privilege};
+    });
 }

@@ -487,25 +487,4 @@ TEST(UserStore, RenamesThatFail)
     }
 }
 
-TEST(UserStore, ModeOfTheStores)
-{
-    const auto mode = [] {
-        struct stat st = {};
-        ::stat(TAVO_USER_DB_SHADOW, &st);
-        return st.st_mode & 07777;
-    };
-    ASSERT_EQ(AddUser({.name = "a"}), 0);
-    EXPECT_EQ(mode(), 0666u);
-    test::WriteFile("/etc.defaults/tavoinfo.conf", "account_store_mode=\"0600\"\n");
-    ForgetStores();
-    ASSERT_EQ(AddUser({.name = "b"}), 0);
-    EXPECT_EQ(mode(), 0600u);
-    for (const char *bad : {"0777", "4666", "066", "x", ""}) {
-        test::WriteFile("/etc.defaults/tavoinfo.conf", std::string("account_store_mode=") + bad + "\n");
-        ForgetStores();
-        ASSERT_TRUE(GetUser("a"));
-        EXPECT_EQ(mode(), 0666u) << bad;
-    }
-}
-
 }  // namespace

@@ -284,7 +284,7 @@ TEST(UserEnum, ListsByFlagAndText)
     EXPECT_EQ(TAVOUserPrivilegeGet("ADMIN"), 0x3F);
     EXPECT_EQ(TAVOUserPrivilegeGet("Guest"), 0);
     EXPECT_EQ(TAVOUserPrivilegeGet("DOM\\joe"), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_NO_SUCH_USER, "user_get"}));
+    EXPECT_EQ(LastFault(), (Fault{ERR_NO_SUCH_USER, "user_privilege_get"}));
 
     TAVOUSER *user = nullptr;
     EXPECT_EQ(TAVOUserGetByUID(900, &user), 0);
