@@ -93,9 +93,7 @@ constexpr AccountKind kGroupKind{
     .id_store = kGidStore,
     .key_size = kGroupKeySize,
     .entries =
-        [](std::span<const std::string> texts) {
-            return GroupStoreEntries(texts[kGroupText], texts[kDescText]);
-        },
+        [](std::span<const std::string> texts) { return GroupStoreEntries(texts[kGroupText], texts[kDescText]); },
 };
 
 }  // namespace tavo

@@ -21,7 +21,8 @@ HashMethod ConfiguredHashMethod();
 
 // A hash of a new password. MD5-crypt takes its setting from HashSetting, the other methods a random salt of full length
 // from the system. Empty when the system cannot make one (a password longer than crypt takes, say). Throws bad_alloc.
-std::string HashPassword(const char *clear, std::string_view previous, time_t now, HashMethod method = HashMethod::kMd5);
+std::string HashPassword(const char *clear, std::string_view previous, time_t now,
+                         HashMethod method = HashMethod::kMd5);
 
 }  // namespace tavo
 

@@ -52,7 +52,8 @@ int UpperCodePage850(std::string_view utf8, SecretBytes &bytes)
         UChar32 character;
         U16_NEXT(units.data(), at, static_cast<int32_t>(units.size()), character);
         const UChar32 larger = u_toupper(character);
-        upper.push_back(static_cast<char16_t>(larger > 0xFFFF ? kReplacement : larger));  // the code page has none of those
+        upper.push_back(
+            static_cast<char16_t>(larger > 0xFFFF ? kReplacement : larger));  // the code page has none of those
     }
     UErrorCode error = U_ZERO_ERROR;
     const std::unique_ptr<UConverter, CloseConverter> code_page(ucnv_open("ibm-850", &error));

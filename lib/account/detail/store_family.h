@@ -27,8 +27,8 @@ struct TextRow {
 };
 
 struct StoreFamily {
-    const char *prefix;     // what the names of all store files of the family begin with
-    const char *seal;       // the record that the stores match the text files
+    const char *prefix;  // what the names of all store files of the family begin with
+    const char *seal;    // the record that the stores match the text files
     const char *marker;  // stands while text files are being moved into place: not under /tmp, it must outlive a reboot
     std::span<const StoreRow> stores;
     std::span<const TextRow> texts;  // in the order in which they are moved into place

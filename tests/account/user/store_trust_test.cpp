@@ -120,8 +120,7 @@ TEST(StoreTrust, WhatOthersMayWriteIsNeverOpened)
             fault(store.c_str());
             const int fd = ::open(store.c_str(), O_RDWR | O_CLOEXEC);
             const ino_t before = Look(store).st_ino;
-            char *mapped =
-                static_cast<char *>(::mmap(nullptr, 4096, PROT_READ | PROT_WRITE, MAP_SHARED, fd, 0));
+            char *mapped = static_cast<char *>(::mmap(nullptr, 4096, PROT_READ | PROT_WRITE, MAP_SHARED, fd, 0));
             ::close(fd);
             ASSERT_NE(mapped, MAP_FAILED);
             TouchBoth();
@@ -222,8 +221,8 @@ void Attack(Loot &loot)
             for (const dirent *entry = nullptr; dir && (entry = ::readdir(dir));) {
                 const std::string name = entry->d_name;
                 const std::string path = std::string(folder) + '/' + name;
-                if (name.starts_with(".db.") || name.find("shadow") != name.npos ||
-                    name.find(".commit") != name.npos || name.find("smbpasswd") != name.npos) {
+                if (name.starts_with(".db.") || name.find("shadow") != name.npos || name.find(".commit") != name.npos ||
+                    name.find("smbpasswd") != name.npos) {
                     LookInto(loot, path);
                     LookInto(loot, path + "/" + ".db.user.shadow.1379");
                 }
@@ -262,8 +261,8 @@ TEST(StoreTrust, AttackWhileAccountsChange)
     const std::string hash = test::GetUser("victim")->szPasswd;
     ASSERT_TRUE(hash.starts_with("$1$"));
     const std::string samba = test::LineOf("/usr/tavo/etc/private/smbpasswd", "victim");
-    auto *loot = static_cast<Loot *>(
-        ::mmap(nullptr, sizeof(Loot), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0));
+    auto *loot =
+        static_cast<Loot *>(::mmap(nullptr, sizeof(Loot), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0));
     ASSERT_NE(loot, MAP_FAILED);
     const pid_t child = ::fork();
     if (child == 0) {
@@ -329,8 +328,10 @@ std::string PublicAnswers()
     std::string text;
     for (const int flags : {int{TAVO_USER_LOCAL}, TAVO_USER_LOCAL | TAVO_USER_DOMAIN_USED, 0})
         text += Listed(TAVOUserEnum, flags) + std::to_string(TAVOUserTotalNum(flags)) + "\n";
-    text += Listed([](TLIBSZLIST **list, int flags) { return TAVOUserEnumByPrefix(list, flags, "a"); }, TAVO_USER_LOCAL);
-    text += Listed([](TLIBSZLIST **list, int flags) { return TAVOUserEnumBySubstr(list, flags, "ö"); }, TAVO_USER_LOCAL);
+    text +=
+        Listed([](TLIBSZLIST **list, int flags) { return TAVOUserEnumByPrefix(list, flags, "a"); }, TAVO_USER_LOCAL);
+    text +=
+        Listed([](TLIBSZLIST **list, int flags) { return TAVOUserEnumBySubstr(list, flags, "ö"); }, TAVO_USER_LOCAL);
     text += std::to_string(TAVOConfGetUserLimit()) + "\n";
     for (const char *name : {"alice", "ALICE", "ÄÖ", "äö", "toor", "nobody", "none", "admin", "guest", "a:b"})
         text += std::to_string(TAVOUserPrivilegeGet(name)) + " ";
