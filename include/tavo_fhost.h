@@ -25,8 +25,10 @@ extern TAVO_API const int32_t FHOSTBroadCastSizeV11;
 extern TAVO_API const int32_t FHOSTBroadCastSizeVDS20;
 
 /* Sends a packet of cbPacket bytes to 255.255.255.255, port 9999, from the address of each of the first eight wired
- * interfaces. Returns the interfaces from which it could not be sent, bit i for interface i (one without an address
- * counts); 0: sent from all, or there is none. Failures are logged; no code is set. */
+ * interfaces. An interface for which neither the kernel nor its file has an address is passed over: nothing is plugged
+ * in, or no DHCP server has answered. Returns the interfaces from which the packet could not be sent, bit i for interface
+ * i: the send failed, the kernel lacks the address that the file of a static interface has, or the interface cannot be
+ * read. 0: sent from all that have an address. Failures are logged; no code is set. */
 TAVO_API uint32_t ErrFHOSTSendBroadcastUdp(const void *pPacket, int cbPacket);
 
 /* Sends the query twice, since broadcasts get lost, and joins the two results. */

@@ -5,6 +5,7 @@
 #include "network/detail/kernel_interface.h"
 #include "network/detail/net_buffer.h"
 
+#include <cerrno>
 #include <charconv>
 #include <cstring>
 
@@ -36,11 +37,11 @@ void PutAddress(TAVONETCARD &card, const InterfaceAddress &found)
 
 }  // namespace
 
-int ReadCard(int index, TAVONETCARD *card)
+CardState ReadCard(int index, TAVONETCARD *card)
 {
     const auto interfaces = WiredInterfaces();
     if (index < 0 || static_cast<size_t>(index) >= interfaces.size())
-        return 0;
+        return CardState::absent;
     const std::string &interface = interfaces[static_cast<size_t>(index)];
     std::memset(card, 0, sizeof *card);
     Put(card->szInterface, interface);
@@ -49,11 +50,14 @@ int ReadCard(int index, TAVONETCARD *card)
     Put(card->szMac, InterfaceAttribute(interface, "address"));
     card->nMtu = Number(InterfaceAttribute(interface, "mtu"));
     card->fLink = InterfaceAttribute(interface, "carrier") == "1";
-    const auto found = AddressOf(interface);
-    if (!found)
-        return -1;
-    PutAddress(*card, *found);
-    return 1;
+    if (const auto found = AddressOf(interface)) {
+        PutAddress(*card, *found);
+        return CardState::has;
+    }
+    if (errno != EADDRNOTAVAIL)
+        return CardState::unreadable;
+    const bool stored = card->nMode != TAVO_NET_DHCP && ParseIpv4(ReadSetting(InterfaceFile(interface), "IPADDR"));
+    return stored ? CardState::lacks : CardState::has_none;
 }
 
 }  // namespace tavo

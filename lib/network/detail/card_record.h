@@ -6,9 +6,16 @@
 
 namespace tavo {
 
-// Reads the index-th wired interface, from 0, into *card. 1; 0 when there are not that many; -1 when it has no address,
-// with the rest of the record filled in.
-int ReadCard(int index, TAVONETCARD *card);
+enum class CardState {
+    absent,      // there are not that many
+    has,         // an address
+    has_none,    // neither the kernel nor the file has one: nothing is plugged in, or the DHCP server has not answered
+    lacks,       // the file of a static card has an address that the kernel has not
+    unreadable,  // the kernel did not answer
+};
+
+// Reads the index-th wired interface, from 0, into *card; of one without an address all the rest is filled in.
+CardState ReadCard(int index, TAVONETCARD *card);
 
 }  // namespace tavo
 

@@ -22,7 +22,7 @@ struct InterfaceAddress {
     Ipv4 mask;
 };
 
-// Empty for an interface without an IPv4 address.
+// Empty with errno: EADDRNOTAVAIL for an interface without an IPv4 address.
 std::optional<InterfaceAddress> AddressOf(const std::string &interface);
 
 // The whole text of a small kernel file; empty when it cannot be opened, with errno.

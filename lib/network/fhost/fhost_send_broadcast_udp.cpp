@@ -67,15 +67,17 @@ extern "C" uint32_t ErrFHOSTSendBroadcastUdp(const void *pPacket, int cbPacket)
         return failed;
     for (int index = 0; index < kInterfaces; ++index) {
         TAVONETCARD card;
-        int found = -1;
+        tavo::CardState state = tavo::CardState::unreadable;
         try {
-            found = tavo::ReadCard(index, &card);
+            state = tavo::ReadCard(index, &card);
         } catch (const std::bad_alloc &) {
             // counts as an interface that cannot be read
         }
-        if (found == 0)
+        if (state == tavo::CardState::absent)
             return failed;
-        if (found < 0 || !SendFrom(card.szIp, pPacket, static_cast<size_t>(cbPacket)))
+        if (state == tavo::CardState::has_none)
+            continue;
+        if (state != tavo::CardState::has || !SendFrom(card.szIp, pPacket, static_cast<size_t>(cbPacket)))
             failed |= 1u << index;
     }
     return failed;

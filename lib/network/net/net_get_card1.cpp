@@ -10,7 +10,7 @@ extern "C" int TAVONetGetCard1(TAVONETCARD *pCard)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         TAVONETCARD card;
-        if (tavo::ReadCard(0, &card) == 0)
+        if (tavo::ReadCard(0, &card) == tavo::CardState::absent)
             return Fail(ERR_FILE_NOT_FOUND);
         *pCard = card;  // an interface that is down has a record, too: with empty addresses
         return 0;

@@ -84,19 +84,39 @@ TEST_F(Discovery, TheQueryLeavesTwiceFromEveryCard)
 TEST_F(Discovery, EachFailureIsABitAndTheOthersAreTried)
 {
     AddCard("eth0", "192.0.2.10");
-    AddCard("eth1");  // no address
+    AddCard("eth1");
+    WriteFile(test::kScripts + "ifcfg-eth1",
+              "DEVICE=eth1\nBOOTPROTO=static\nIPADDR=192.0.2.11\n");  // not in the kernel
     AddCard("eth2", "192.0.2.12");
     AddCard("eth3", "192.0.2.13");
+    AddCard("eth4", "unreadable");
     AddCard("eth10", "192.0.2.20");
     no_bind_to = "192.0.2.12:0";
     no_send_from = "192.0.2.13:0";
-    EXPECT_EQ(ErrFHOSTSendBroadcastUdp("hello", 5), 0xEu);
+    EXPECT_EQ(ErrFHOSTSendBroadcastUdp("hello", 5), 0x1Eu);
     ASSERT_EQ(sent.size(), 2u);
     EXPECT_EQ(sent[1].from, "192.0.2.20:0") << "the last one";
     EXPECT_EQ(sent[1].bytes, "hello");
     EXPECT_THAT(log_.Texts(), ElementsAre(MatchesRegex("bind\\(sockfd=[0-9]+, brdcast.sin_addr.s_addr = [0-9]+\\) "
                                                        "error!! errno=99, err_str=\\[.*\\]"),
                                           "sendto error."));
+}
+
+// A port without a cable is not a failure, and the ports after it keep their bits.
+TEST_F(Discovery, CardsWithoutAnAddressArePassedOver)
+{
+    AddCard("eth0");
+    WriteFile(test::kScripts + "ifcfg-eth0", "DEVICE=eth0\nBOOTPROTO=dhcp\nIPADDR=192.0.2.9\n");
+    AddCard("eth1");
+    WriteFile(test::kScripts + "ifcfg-eth1", "DEVICE=eth1\nBOOTPROTO=static\n");
+    AddCard("eth2");
+    EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u) << "none is configured";
+    EXPECT_THAT(sent, IsEmpty());
+    AddCard("eth3", "192.0.2.13");
+    EXPECT_EQ(ErrFHOSTSendBroadcastUdp("x", 1), 0u);
+    EXPECT_EQ(sent.size(), 1u);
+    no_send_from = "192.0.2.13:0";
+    EXPECT_EQ(ErrFHOSTSendBroadcastUdp("x", 1), 0x8u);
 }
 
 TEST_F(Discovery, TenCardsAreMoreThanAreAsked)

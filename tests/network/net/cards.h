@@ -42,7 +42,7 @@ class Cards : public testing::Test {
         SetRoutes("");
     }
 
-    // An empty address: the card has none.
+    // An empty address: the card has none; "unreadable": the kernel does not say.
     void AddCard(const std::string &name, const std::string &address = "", const std::string &mask = "255.255.255.0")
     {
         const std::string folder = "/sys/class/net/" + name;
@@ -81,6 +81,10 @@ class Cards : public testing::Test {
         const auto found = addresses_.find(ask.ifr_name);
         if (found == addresses_.end()) {
             errno = EADDRNOTAVAIL;
+            return -1;
+        }
+        if (found->second.first == "unreadable") {
+            errno = EIO;
             return -1;
         }
         sockaddr_in answer = {};

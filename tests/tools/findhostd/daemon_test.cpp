@@ -134,9 +134,14 @@ TEST_F(Daemons, AreFoundFromTheInterfacesThatWork)
     VirtualCable second("second");
     second.Plug(*nodes_[0], "eth1");  // down, without an address
     EXPECT_TRUE(nodes_[0]->Run([] {
-        EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0x2u);
+        EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u) << "two ports, one cable";
         EXPECT_TRUE(Eventually([] { return Lines(ListText()).size() == 2; })) << ListText();
         EXPECT_THAT(Lines(ListText()), UnorderedElementsAre("6,240,nas2,192.0.2.2,eth0", "6,240,nas3,192.0.2.3,eth0"));
+        EXPECT_THAT(Discover(2), UnorderedElementsAre("nas2(192.0.2.2)", "nas3(192.0.2.3)"));
+
+        // An address that somebody stored and the kernel has lost is a failure.
+        WriteFile("/etc/sysconfig/network-scripts/ifcfg-eth1", "DEVICE=eth1\nBOOTPROTO=static\nIPADDR=198.51.100.1\n");
+        EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0x2u);
         int result = 0;
         EXPECT_THAT(Discover(2, &result), IsEmpty());
         EXPECT_EQ(result, -1) << "one interface could not send";
