@@ -104,9 +104,10 @@ TAVO_API int TAVONetGetCard1(TAVONETCARD *pCard);
 /* Gives the interface pCard->szInterface its address. With DHCP a client that runs is killed, then a new one has 30 s to
  * get a lease; with a static address szIp and szMask are applied and stored. pPrevious is the record as it was (NULL when
  * there is none): where the address changes, the dynamic-DNS daemon is told. Then routes that are missing are added: the
- * connected networks and the stored gateway.
- * Returns 0; -2 when the interface has its address but its file could not be written; or -1 with the old settings in
- * force and
+ * connected networks and the default route. The stored gateway belongs to a static address of the first card; with DHCP
+ * the one of the lease counts, and the stored one only when the lease names none and there is no default route.
+ * Returns 0; -2 when the interface has its address but its file could not be written; or -1 with the old address and
+ * routes in force (a DHCP client that ran is started again, without waiting for it) and
  *   ERR_BAD_PARAMETERS   pCard is NULL, or its interface is no name
  *   ERR_INVALID_NETNAME  the address or the mask is not valid
  *   ERR_LOCK_FAILED
@@ -132,10 +133,19 @@ TAVO_API int TAVONetDefaultGatewaySet(const char *szGateway);
  * (none is stored), ERR_NOT_ENOUGH_MEMORY or ERR_OPEN_FAILED. */
 TAVO_API int TAVOLnxGetHostname(char *szName, int cbName);
 
-/* Stores the host name, rewrites the lines of /etc/hosts that name localhost and the appliance (the administrator's
- * lines stay), and gives the name to the kernel. Returns 0, or -1 with ERR_BAD_PARAMETERS (NULL), ERR_INVALID_NETNAME,
- * ERR_LOCK_FAILED, ERR_SYS_UNKNOWN (the kernel refused; the name is stored) or a code of the settings files. */
+/* Stores the host name, rewrites the two lines of /etc/hosts that name localhost and the appliance (the administrator's
+ * lines stay; the name stands for the address of the first wired interface that has one, or for 127.0.1.1), and gives the
+ * name to the kernel. Returns 0, or -1 with the old name everywhere and ERR_BAD_PARAMETERS (NULL), ERR_INVALID_NETNAME,
+ * ERR_LOCK_FAILED, ERR_SYS_UNKNOWN (the kernel refused) or a code of the settings files. */
 TAVO_API int TAVOLnxSetHostname(const char *szName);
+
+/* Rewrites the line of /etc/hosts that names the appliance where it is not true any more: the host name (the kernel's
+ * where none is stored) at the address of the first wired interface that has one, or at 127.0.1.1. Functions that change
+ * an address do that themselves; this one is for the hook of the DHCP client. It never waits: while somebody holds the
+ * network lock it does nothing, and the holder rewrites the file when it is done.
+ * Returns 0 (the file is true), 1 (left to the holder of the lock), or -1 with ERR_CREATE_FAILED or ERR_OPEN_FAILED (of
+ * the lock files) or a code of the settings files. */
+TAVO_API int TAVONetHostsRefresh(void);
 
 /* Pushes the name servers of /etc/resolv.conf onto *ppServers, which may move. Returns how many, or -1 with
  * ERR_BAD_PARAMETERS, ERR_OPEN_FAILED or ERR_OUT_OF_MEMORY. */
@@ -152,9 +162,10 @@ TAVO_API int TAVONetDNSSet(const TLIBSZLIST *pServers);
 TAVO_API int TAVOConfGetMTUValue(const char *szInterface, char *szMtu, int cbMtu);
 TAVO_API int TAVOGetMTUSetting(const char *szInterface);
 
-/* Sets the MTU, 68 to 65535 bytes: stored (under the lock of the system settings), in the kernel, or both in this order.
- * Return 0, or -1 with ERR_BAD_PARAMETERS, ERR_LOCK_FAILED, ERR_OP_FAILURE (ifconfig failed) or a code of the settings
- * files. */
+/* Sets the MTU, 68 to 65535 bytes: stored (under the lock of the system settings), in the kernel (under the network
+ * lock), or both: in the kernel first, so that nothing is stored that the card refuses, with both locks in one request.
+ * Return 0, or -1 with nothing changed and ERR_BAD_PARAMETERS, ERR_LOCK_FAILED, ERR_OP_FAILURE (ifconfig failed) or a code
+ * of the settings files. */
 TAVO_API int TAVOConfSetMTUValue(const char *szInterface, int mtu);
 TAVO_API int TAVONetSetMTUEth(const char *szInterface, int mtu);
 TAVO_API int TAVONetSetMTUValue(const char *szInterface, int mtu);
@@ -225,7 +236,7 @@ TAVO_API int TAVONetWolGet(const char *szInterface);
 
 /* Lets the interface wake the appliance (fEnable not 0; on which packets is said by "wol_enabled_options" in
  * /etc/tavoinfo.conf, letters as ethtool knows them, such as "g") or no more, and stores that as "NAME_wol_options". The
- * controller of a front panel cannot be told to stop. Returns 0, or -1 with ERR_KEY_NOT_FOUND or ERR_FORMAT_ERROR (no
+ * controller of a front panel cannot be told to stop, and is told under lock_ttys1. Returns 0, or -1 with ERR_KEY_NOT_FOUND or ERR_FORMAT_ERROR (no
  * options to enable, or letters that are none), ERR_LOCK_FAILED or a code of the settings files. */
 TAVO_API int TAVONetWolSet(const char *szInterface, int fEnable);
 
@@ -254,8 +265,8 @@ TAVO_API int TAVONetLinkAggrOptSlsaveAdd(TAVONETLINKAGGR *pAggr, const char *szI
  * the first member's address, a changed one keeps its own), and the network is started again. Nothing is done when all is
  * as asked. Wherever the process dies, the files describe a network that starts.
  * Returns 0, or -1 with ERR_BAD_PARAMETERS, ERR_LINK_AGGR_TYPE (szBond is an interface that is no bond), ERR_LOCK_FAILED,
- * ERR_WRITE_FAILED (either nothing was done, or the saved files are back and the network is started) or ERR_OP_FAILURE
- * (the network did not start). */
+ * ERR_READ_FAILED or ERR_WRITE_FAILED (the files are as they were, and the network is started) or ERR_OP_FAILURE (the
+ * network did not start; the old files are back, and the old network was started). */
 TAVO_API int TAVONetLinkAggrSet(const TAVONETLINKAGGR *pAggr);
 
 TAVO_END_DECLS

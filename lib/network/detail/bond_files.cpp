@@ -181,22 +181,11 @@ bool BondChange::Make()
     return members_.empty() || bond_file_.temp.RenameTo(bond_file_.target);
 }
 
-void BondChange::PutBack()
-{
-    for (const std::string &member : members_) {
-        if (HasCopyToRestore(member))
-            RestoreMember(member);
-    }
-    ::unlink(InterfaceFile(bond_).c_str());
-}
-
 bool BondChange::Apply()
 {
     const bool done = Dissolve() && Make() &&
                       std::all_of(member_files_.begin(), member_files_.end(),
                                   [](NewFile &file) { return file.temp.RenameTo(file.target); });
-    if (!done)
-        PutBack();
     SyncPath(kInterfaceFolder, O_RDONLY | O_DIRECTORY);
     return done;
 }

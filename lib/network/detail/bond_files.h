@@ -27,7 +27,7 @@ class BondChange {
     // runs. Mode none dissolves; `members` are then those that become plain interfaces even without a copy to restore.
     bool Prepare(const std::string &bond, BondMode mode, const std::vector<std::string> &members);
 
-    // Puts them in place. When it fails the members' saved files are back and there is no bond.
+    // Puts them in place. When it fails some of them are, and the caller puts the old ones back.
     bool Apply();
 
   private:
@@ -39,7 +39,6 @@ class BondChange {
     bool PrepareFile(NewFile &file, const std::string &interface, const std::string &text);
     bool Dissolve();
     bool Make();
-    void PutBack();
 
     std::string bond_;
     std::vector<std::string> members_;   // of the new bond

@@ -1,22 +1,19 @@
 // The routes that must be there whatever happened to an interface.
 #include "network/detail/connected_route.h"
 
+#include "network/detail/dhcp_client.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/kernel_interface.h"
 #include "network/detail/net_command.h"
 #include "network/detail/route_change.h"
-#include "network/detail/route_table.h"
 
 #include <algorithm>
+#include <ranges>
+
+#include <net/route.h>
 
 namespace tavo {
 namespace {
-
-std::vector<Route> Routes()
-{
-    const auto text = ReadKernelFile("/proc/net/route");
-    return text ? ParseRouteTable(*text).value_or(std::vector<Route>()) : std::vector<Route>();
-}
 
 void RepairConnected(const std::vector<Route> &routes, const std::string &interface)
 {
@@ -32,22 +29,71 @@ void RepairConnected(const std::vector<Route> &routes, const std::string &interf
         RunRouteTool("add", Ipv4Route{Ipv4::FromWord(network), found->mask}, interface.c_str());
 }
 
+void AddDefault(const Ipv4 &gateway)
+{
+    RunNetCommand("/sbin/route add default gw %s > /dev/null 2>&1", gateway.Text());
+}
+
+void RepairDefault(const std::vector<Route> &routes, const std::string &card, bool dhcp)
+{
+    const auto stored = ParseIpv4(ReadSetting(kNetworkFile, "GATEWAY"));
+    if (dhcp) {
+        const auto leased = ParseIpv4(ReadSetting(DhcpLeaseFile(card), "GATEWAY"));
+        const auto gateway = leased ? leased : stored;
+        if (gateway && std::none_of(routes.begin(), routes.end(), [](const Route &route) { return route.IsDefault(); }))
+            AddDefault(*gateway);
+        return;
+    }
+    const auto leads_there = [&](const Route &route) {
+        return route.IsDefault() && route.gateway.Word() == stored->Word();
+    };
+    if (stored && std::none_of(routes.begin(), routes.end(), leads_there))
+        AddDefault(*stored);
+}
+
+void AddRoute(const Route &route)
+{
+    if (route.IsDefault() && route.metric == 0)
+        return AddDefault(route.gateway);
+    const std::string via = route.flags & RTF_GATEWAY ? " gw " + route.gateway.Text() : "";
+    const std::string metric = route.metric != 0 ? " metric " + std::to_string(route.metric) : "";
+    RunNetCommand("/sbin/route add -net %s netmask %s%s%s dev %s > /dev/null 2>&1", route.destination.Text(),
+                  route.mask.Text(), ComposedPiece{via}, ComposedPiece{metric}, route.interface);
+}
+
 }  // namespace
 
-void RepairRoutes()
+std::vector<Route> LiveRoutes()
 {
-    const std::vector<Route> routes = Routes();
-    for (const std::string &interface : WiredInterfaces())
-        RepairConnected(routes, interface);
+    const auto text = ReadKernelFile("/proc/net/route");
+    return text ? ParseRouteTable(*text).value_or(std::vector<Route>()) : std::vector<Route>();
+}
 
-    const auto stored = ParseIpv4(ReadSetting(kNetworkFile, "GATEWAY"));
-    if (!stored)
-        return;
-    const bool present = std::any_of(routes.begin(), routes.end(), [&](const Route &route) {
-        return route.IsDefault() && route.gateway.Word() == stored->Word();
-    });
-    if (!present)
-        RunNetCommand("/sbin/route add default gw %s > /dev/null 2>&1", stored->Text());
+void RepairRoutes(const std::string &interface, bool dhcp)
+{
+    const std::vector<Route> routes = LiveRoutes();
+    const std::vector<std::string> cards = WiredInterfaces();
+    for (const std::string &card : cards)
+        RepairConnected(routes, card);
+    const std::string &first = cards.empty() ? interface : cards.front();
+    RepairDefault(routes, first, first == interface ? dhcp : ReadSetting(InterfaceFile(first), "BOOTPROTO") == "dhcp");
+}
+
+void PutBackRoutes(const std::vector<Route> &before, const std::vector<Route> &now, const std::string &interface)
+{
+    const auto own = AddressOf(interface);
+    const auto is_own_network = [&](const Route &route) {
+        return own && !(route.flags & RTF_GATEWAY) && route.mask.Word() == own->mask.Word() &&
+               route.destination.Word() == (own->address.Word() & own->mask.Word());
+    };
+    // Networks on the link first, a router may be on one. From the last one on: a new route goes before its equals.
+    for (const uint32_t through_router : {0u, uint32_t{RTF_GATEWAY}}) {
+        for (const Route &route : std::views::reverse(before)) {
+            if (route.interface == interface && (route.flags & RTF_GATEWAY) == through_router &&
+                !is_own_network(route) && std::find(now.begin(), now.end(), route) == now.end())
+                AddRoute(route);
+        }
+    }
 }
 
 }  // namespace tavo

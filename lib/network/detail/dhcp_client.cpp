@@ -3,6 +3,7 @@
 
 #include "core/detail/pid_file.h"
 #include "core/detail/process_list.h"
+#include "network/detail/net_command.h"
 
 #include <cerrno>
 #include <csignal>
@@ -34,9 +35,19 @@ std::string DhcpLeaseFile(const std::string &interface)
     return "/etc/dhcpc/dhcpcd-" + interface + ".info";
 }
 
+bool HasDhcpClient(const std::string &interface)
+{
+    return IsDhcpClient(ReadPidFile(DhcpPidFile(interface).c_str()).value_or(0));
+}
+
+void StartDhcpClient(const std::string &interface)
+{
+    RunNetCommand("/sbin/dhcpcd -n %s -t %d > /dev/null 2>&1 &", interface, kDhcpSeconds);
+}
+
 ClientEnd KillDhcpClient(const std::string &interface)
 {
-    if (!IsDhcpClient(ReadPidFile(DhcpPidFile(interface).c_str()).value_or(0)))
+    if (!HasDhcpClient(interface))
         return ClientEnd::gone;
     if (SignalByPidFile(DhcpPidFile(interface).c_str(), SIGKILL) == PidSignal::failed && errno != ESRCH)
         return ClientEnd::alive;

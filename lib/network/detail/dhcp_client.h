@@ -16,7 +16,15 @@ enum class ClientEnd {
 // One attempt. A pid file that names no process, or somebody else's, names no client.
 ClientEnd KillDhcpClient(const std::string &interface);
 
-// The lease that the client noted: its file, with IPADDR and NETMASK.
+// Whether a client takes care of the interface.
+bool HasDhcpClient(const std::string &interface);
+
+// Starts one without waiting for its lease.
+void StartDhcpClient(const std::string &interface);
+
+inline constexpr int kDhcpSeconds = 30;  // for a lease
+
+// The lease that the client noted: its file, with IPADDR, NETMASK and, where the server named one, GATEWAY.
 std::string DhcpLeaseFile(const std::string &interface);
 
 }  // namespace tavo

@@ -1,10 +1,22 @@
-// The text of /etc/hosts: two lines are the appliance's, the rest is the administrator's.
+// /etc/hosts: two lines are the appliance's, the rest is the administrator's.
 #include "network/detail/hosts_file.h"
 
+#include "core/detail/file_rewrite.h"
 #include "core/detail/text_fields.h"
+#include "network/detail/interface_file.h"
+#include "network/detail/kernel_interface.h"
+#include "tavo_error.h"
+
+#include <algorithm>
+#include <cerrno>
+
+#include <unistd.h>
 
 namespace tavo {
 namespace {
+
+// What the name stands for while no card has an address: local programs look it up all the same.
+constexpr const char *kNoAddress = "127.0.1.1";
 
 // A line that says nothing but what the two managed lines say.
 bool IsManaged(std::string_view line, std::string_view old_name, std::string_view new_name)
@@ -14,6 +26,28 @@ bool IsManaged(std::string_view line, std::string_view old_name, std::string_vie
         return false;
     return (field[0] == "127.0.0.1" && field[1] == "localhost") || field[1] == new_name ||
            (!old_name.empty() && field[1] == old_name);
+}
+
+std::string OwnAddress()
+{
+    for (const std::string &interface : WiredInterfaces()) {
+        if (const auto found = AddressOf(interface))
+            return found->address.Text();
+    }
+    return kNoAddress;
+}
+
+// One word of printable characters: the file is other programs' syntax.
+bool IsOneWord(std::string_view name)
+{
+    return !name.empty() &&
+           std::all_of(name.begin(), name.end(), [](char byte) { return byte > ' ' && byte < 0x7F && byte != '#'; });
+}
+
+std::string NewText(std::string_view text, std::string_view old_name)
+{
+    const std::string name = OwnHostName();
+    return name.empty() ? std::string(text) : HostsWithName(text, old_name, name, OwnAddress());
 }
 
 }  // namespace
@@ -30,6 +64,33 @@ std::string HostsWithName(std::string_view old_text, std::string_view old_name, 
             text.append(line).append("\n");
     }
     return text;
+}
+
+std::string OwnHostName()
+{
+    if (std::string stored = ReadSetting(kNetworkFile, "HOSTNAME"); IsOneWord(stored))
+        return stored;
+    char name[256] = "";
+    ::gethostname(name, sizeof name - 1);
+    return IsOneWord(name) ? name : "";
+}
+
+int UpdateHosts(std::string_view old_name)
+{
+    FileRewrite rewrite;
+    std::string text;
+    if (const int code = rewrite.Open(kHostsFile); code != 0 && !rewrite.IsMissing())
+        return code;
+    if (!rewrite.IsMissing() && !rewrite.Read(text))
+        return ERR_READ_FAILED;
+    const std::string edited = NewText(text, old_name);
+    return edited == text ? 0 : rewrite.Replace(edited, 0644);
+}
+
+bool AreHostsTrue()
+{
+    const auto text = ReadKernelFile(kHostsFile);
+    return text ? NewText(*text, {}) == *text : errno != ENOENT;
 }
 
 }  // namespace tavo

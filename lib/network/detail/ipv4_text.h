@@ -13,6 +13,7 @@ namespace tavo {
 struct Ipv4 {
     std::array<int, 4> octet{};  // each 0 to 255
 
+    bool operator==(const Ipv4 &) const noexcept = default;
     uint32_t Word() const noexcept;  // first octet highest
     static Ipv4 FromWord(uint32_t word) noexcept;
     std::string Text() const;

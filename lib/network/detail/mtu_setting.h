@@ -11,6 +11,11 @@ inline constexpr const char *kMtuDefault = "1500";
 inline constexpr int kMtuLeast = 68;  // what IPv4 needs to work at all
 inline constexpr int kMtuMost = 65535;
 
+constexpr bool IsMtu(int mtu) noexcept
+{
+    return mtu >= kMtuLeast && mtu <= kMtuMost;
+}
+
 struct MtuKey {
     char text[32];
 

@@ -2,11 +2,8 @@
 #ifndef TAVO_NETWORK_DETAIL_ROUTE_CHANGE_H
 #define TAVO_NETWORK_DETAIL_ROUTE_CHANGE_H
 
-#include "core/detail/lock_hold.h"
 #include "network/detail/ipv4_text.h"
 #include "network/detail/ipv6_text.h"
-#include "network/detail/network_lock.h"
-#include "tavo_error.h"
 
 #include <optional>
 
@@ -31,16 +28,6 @@ std::optional<Ipv6Route> ParseRoute(const char *network, int length, const char 
 int RunRouteTool(const char *verb, const Ipv4Route &route, const char *interface);
 // "/sbin/ip -6 route VERB NETWORK/LENGTH [via GATEWAY] dev INTERFACE".
 int RunRouteTool(const char *verb, const Ipv6Route &route, const char *interface);
-
-// The same under the network's lock: 0, ERR_LOCK_FAILED or ERR_OP_FAILURE.
-template <class Route>
-int ChangeRoute(const char *verb, const Route &route, const char *interface)
-{
-    const LockHold lock(kNetworkExclusive, kNetworkSeconds);
-    if (!lock)
-        return ERR_LOCK_FAILED;
-    return RunRouteTool(verb, route, interface) == 0 ? 0 : ERR_OP_FAILURE;
-}
 
 }  // namespace tavo
 

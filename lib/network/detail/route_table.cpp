@@ -15,10 +15,10 @@ constexpr std::string_view kHeader[] = {"Iface",  "Destination", "Gateway", "Fla
                                         "Metric", "Mask",        "MTU",     "Window", "IRTT"};
 constexpr size_t kFields = std::size(kHeader);
 
-std::optional<uint32_t> ReadHex(std::string_view text)
+std::optional<uint32_t> ReadNumber(std::string_view text, int base)
 {
     uint32_t value = 0;
-    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value, 16);
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value, base);
     if (error != std::errc() || end != text.data() + text.size())
         return std::nullopt;
     return value;
@@ -27,7 +27,7 @@ std::optional<uint32_t> ReadHex(std::string_view text)
 // The table shows an address as the word that it is in memory: first octet lowest on the processors that we run on.
 std::optional<Ipv4> ReadAddress(std::string_view text)
 {
-    const auto word = ReadHex(text);
+    const auto word = ReadNumber(text, 16);
     if (!word)
         return std::nullopt;
     return Ipv4::FromWord(ntohl(*word));
@@ -53,10 +53,11 @@ std::optional<std::vector<Route>> ParseRouteTable(std::string_view text)
             continue;
         const auto destination = ReadAddress(field[1]);
         const auto gateway = ReadAddress(field[2]);
-        const auto flags = ReadHex(field[3]);
+        const auto flags = ReadNumber(field[3], 16);
+        const auto metric = ReadNumber(field[6], 10);
         const auto mask = ReadAddress(field[7]);
-        if (destination && gateway && flags && mask)
-            routes.push_back({std::string(field[0]), *destination, *gateway, *mask, *flags});
+        if (destination && gateway && flags && metric && mask)
+            routes.push_back({std::string(field[0]), *destination, *gateway, *mask, *flags, *metric});
     }
     return routes;
 }

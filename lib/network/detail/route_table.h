@@ -17,9 +17,11 @@ struct Route {
     Ipv4 destination;
     Ipv4 gateway;
     Ipv4 mask;
-    uint32_t flags = 0;  // RTF_ bits of <net/route.h>
+    uint32_t flags = 0;   // RTF_ bits of <net/route.h>
+    uint32_t metric = 0;  // the route with the least one is used
 
     bool IsDefault() const noexcept;
+    bool operator==(const Route &) const noexcept = default;
 };
 
 // Empty when the header line is not the one that this format has; rows that do not parse are left out.

@@ -11,7 +11,7 @@
 
 extern "C" int TAVOConfSetMTUValue(const char *szInterface, int mtu)
 {
-    if (!szInterface || mtu < tavo::kMtuLeast || mtu > tavo::kMtuMost)
+    if (!szInterface || !tavo::IsMtu(mtu))
         return Fail(ERR_BAD_PARAMETERS);
     if (!tavo::IsInterfaceName(szInterface)) {
         LogError("%s:%d interface name is too long");

@@ -15,7 +15,7 @@ extern "C" int TAVOGetMTUSetting(const char *szInterface)
     int mtu = 0;
     const char *const end = text + std::strlen(text);
     const auto [next, error] = std::from_chars(text, end, mtu);
-    if (error != std::errc() || next != end || mtu < tavo::kMtuLeast || mtu > tavo::kMtuMost)
+    if (error != std::errc() || next != end || !tavo::IsMtu(mtu))
         return Fail(ERR_FORMAT_ERROR);
     return mtu;
 }

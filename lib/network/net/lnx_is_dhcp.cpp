@@ -4,32 +4,41 @@
 #include "tavo_file.h"
 
 #include "core/detail/guard.h"
-#include "core/detail/lock_hold.h"
-#include "core/detail/log.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/interface_name.h"
-#include "network/detail/network_lock.h"
+#include "network/detail/network_change.h"
 
 #include <cstring>
+
+namespace {
+
+bool IsDhcp(const char *interface)
+{
+    const tavo::LockHold lock(tavo::kNetworkShared, tavo::kNetworkSeconds);
+    if (!lock) {
+        LogError("%s(%d) ErrTLIBFileLock failed.");
+        return false;
+    }
+    char protocol[16];
+    const std::string file = tavo::InterfaceFile(interface);
+    if (TLIBFileGetKeyValue(file.c_str(), "BOOTPROTO", protocol, sizeof protocol, 0) > 0)
+        return std::strcmp(protocol, "dhcp") == 0;
+    LogError("%s(%d) Get BOOTPROTO failed.(%X)", TLIBErrGet());
+    // The start-up script needs the key: an interface without one stays down.
+    if (TLIBFileSetKeyValue(file.c_str(), "BOOTPROTO", "static", nullptr) < 0)
+        LogError("%s(%d) TLIBFileSetKeyValue(%s, BOOTPROTO, static) failed.(%X)", file, TLIBErrGet());
+    return false;
+}
+
+}  // namespace
 
 extern "C" int BlTAVOLnxIsDHCP(const char *szInterface)
 {
     if (!szInterface || !tavo::IsInterfaceName(szInterface))
         return FailZero(ERR_BAD_PARAMETERS);
     return Guard([&]() -> bool {
-        const tavo::LockHold lock(tavo::kNetworkShared, tavo::kNetworkSeconds);
-        if (!lock) {
-            LogError("%s(%d) ErrTLIBFileLock failed.");
-            return false;
-        }
-        char protocol[16];
-        const std::string file = tavo::InterfaceFile(szInterface);
-        if (TLIBFileGetKeyValue(file.c_str(), "BOOTPROTO", protocol, sizeof protocol, 0) > 0)
-            return std::strcmp(protocol, "dhcp") == 0;
-        LogError("%s(%d) Get BOOTPROTO failed.(%X)", TLIBErrGet());
-        // The start-up script needs the key: an interface without one stays down.
-        if (TLIBFileSetKeyValue(file.c_str(), "BOOTPROTO", "static", nullptr) < 0)
-            LogError("%s(%d) TLIBFileSetKeyValue(%s, BOOTPROTO, static) failed.(%X)", file, TLIBErrGet());
-        return false;
+        const bool answer = IsDhcp(szInterface);
+        tavo::KeepHostsTrueAfterwards();  // a client whose hook met the lock left it to us
+        return answer;
     });
 }

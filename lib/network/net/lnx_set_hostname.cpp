@@ -3,14 +3,10 @@
 
 #include "tavo_file.h"
 
-#include "core/detail/file_rewrite.h"
 #include "core/detail/guard.h"
-#include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
-#include "network/detail/hosts_file.h"
 #include "network/detail/interface_file.h"
-#include "network/detail/kernel_interface.h"
-#include "network/detail/network_lock.h"
+#include "network/detail/network_change.h"
 
 #include <cstring>
 
@@ -18,27 +14,32 @@
 
 namespace {
 
-constexpr const char *kHosts = "/etc/hosts";
-
-// The address that the name stands for is the first one that the appliance has.
-std::string FirstAddress()
+void PutBack(const std::string &stored, const char *refused)
 {
-    for (const std::string &interface : tavo::WiredInterfaces()) {
-        if (const auto found = tavo::AddressOf(interface))
-            return found->address.Text();
-    }
-    return "";
+    const tavo::KeepFault keep;
+    if (stored.empty())
+        TLIBFileRemoveKey(tavo::kNetworkFile, "HOSTNAME");
+    else
+        TLIBFileSetKeyValue(tavo::kNetworkFile, "HOSTNAME", stored.c_str(), nullptr);
+    tavo::UpdateHosts(refused);
 }
 
-int RewriteHosts(const std::string &old_name, const char *new_name)
+int SetName(const char *name)
 {
-    tavo::FileRewrite rewrite;
-    std::string text;
-    if (const int code = rewrite.Open(kHosts); code != 0 && !rewrite.IsMissing())
-        return code;
-    if (!rewrite.IsMissing() && !rewrite.Read(text))
-        return ERR_READ_FAILED;
-    return rewrite.Replace(tavo::HostsWithName(text, old_name, new_name, FirstAddress()), 0644);
+    const std::string stored = tavo::ReadSetting(tavo::kNetworkFile, "HOSTNAME");
+    const std::string old_name = tavo::OwnHostName();
+    if (TLIBFileSetKeyValue(tavo::kNetworkFile, "HOSTNAME", name, nullptr) < 0)
+        return Fail(TLIBErrGet());
+    if (const int code = tavo::UpdateHosts(old_name)) {
+        LogError("%s:%d Set %s error.", tavo::kHostsFile);
+        PutBack(stored, name);
+        return Fail(code);
+    }
+    if (::sethostname(name, std::strlen(name)) != 0) {
+        PutBack(stored, name);
+        return Fail(ERR_SYS_UNKNOWN);
+    }
+    return 0;
 }
 
 }  // namespace
@@ -49,19 +50,5 @@ extern "C" int TAVOLnxSetHostname(const char *szName)
         return Fail(ERR_BAD_PARAMETERS);
     if (!BlTLIBIsHostname(szName))
         return Fail(ERR_INVALID_NETNAME);
-    return Guard([&] {
-        const tavo::LockHold lock(tavo::kNetworkExclusive, tavo::kNetworkSeconds);
-        if (!lock)
-            return Fail(ERR_LOCK_FAILED);
-        const std::string old_name = tavo::ReadSetting(tavo::kNetworkFile, "HOSTNAME");
-        if (TLIBFileSetKeyValue(tavo::kNetworkFile, "HOSTNAME", szName, nullptr) < 0)
-            return Fail(TLIBErrGet());
-        if (const int code = RewriteHosts(old_name, szName)) {
-            LogError("%s:%d Set %s error.", kHosts);
-            return Fail(code);
-        }
-        if (::sethostname(szName, std::strlen(szName)) != 0)
-            return Fail(ERR_SYS_UNKNOWN);
-        return 0;
-    });
+    return Guard([&] { return tavo::ChangeNetwork([&] { return SetName(szName); }); });
 }

@@ -4,13 +4,11 @@
 #include "tavo_file.h"
 
 #include "core/detail/guard.h"
-#include "core/detail/keep_fault.h"
-#include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/ipv4_text.h"
 #include "network/detail/net_command.h"
-#include "network/detail/network_lock.h"
+#include "network/detail/network_change.h"
 
 namespace {
 
@@ -37,6 +35,27 @@ std::string LiveGateway()
     return TAVONetDefaultGatewayGet(gateway, sizeof gateway) == 0 ? gateway : "";
 }
 
+int SetGateway(const std::string &gateway)
+{
+    const std::string live = LiveGateway();
+    const std::string stored = tavo::ReadSetting(tavo::kNetworkFile, "GATEWAY");
+
+    tavo::RunNetCommand("/sbin/route delete default > /dev/null 2>&1");
+    if (TLIBFileSetKeyValue(tavo::kNetworkFile, "GATEWAY", gateway.c_str(), nullptr) < 0) {
+        const int code = TLIBErrGet();
+        LogError("%s(%d): TLIBFileSetKeyValue(%s, GATEWAY, %s) failed.(%X)", tavo::kNetworkFile, gateway, code);
+        if (!live.empty())
+            AddDefault(live);
+        return Fail(code);
+    }
+    if (AddDefault(gateway) != 0) {
+        LogError("%s(%d): failed to set default gateway.");
+        PutBack(live, stored);
+        return Fail(ERR_OP_FAILURE);
+    }
+    return 0;
+}
+
 }  // namespace
 
 extern "C" int TAVONetDefaultGatewaySet(const char *szGateway)
@@ -46,26 +65,7 @@ extern "C" int TAVONetDefaultGatewaySet(const char *szGateway)
     if (!BlTLIBIsIpAddr(szGateway))
         return Fail(ERR_INVALID_NETNAME);
     return Guard([&] {
-        const tavo::LockHold lock(tavo::kNetworkExclusive, tavo::kNetworkSeconds);
-        if (!lock)
-            return Fail(ERR_LOCK_FAILED);
         const std::string gateway = tavo::ParseIpv4(szGateway)->Text();  // to the tool "010" is 8
-        const std::string live = LiveGateway();
-        const std::string stored = tavo::ReadSetting(tavo::kNetworkFile, "GATEWAY");
-
-        tavo::RunNetCommand("/sbin/route delete default > /dev/null 2>&1");
-        if (TLIBFileSetKeyValue(tavo::kNetworkFile, "GATEWAY", gateway.c_str(), nullptr) < 0) {
-            const int code = TLIBErrGet();
-            LogError("%s(%d): TLIBFileSetKeyValue(%s, GATEWAY, %s) failed.(%X)", tavo::kNetworkFile, gateway, code);
-            if (!live.empty())
-                AddDefault(live);
-            return Fail(code);
-        }
-        if (AddDefault(gateway) != 0) {
-            LogError("%s(%d): failed to set default gateway.");
-            PutBack(live, stored);
-            return Fail(ERR_OP_FAILURE);
-        }
-        return 0;
+        return tavo::ChangeNetwork([&] { return SetGateway(gateway); });
     });
 }

@@ -3,10 +3,9 @@
 
 #include "core/detail/file_rewrite.h"
 #include "core/detail/guard.h"
-#include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
 #include "network/detail/ipv4_text.h"
-#include "network/detail/network_lock.h"
+#include "network/detail/network_change.h"
 
 #include <cerrno>
 #include <cstring>
@@ -36,6 +35,18 @@ void LogFailure(int code)
         LogError("%s (%d) fflush failed.(%s)", std::strerror(errno));
 }
 
+int Write(const std::string &text)
+{
+    tavo::FileRewrite rewrite;
+    int code = rewrite.Open(kResolver);
+    if (code == 0 || rewrite.IsMissing())
+        code = rewrite.Replace(text, 0644);
+    if (code == 0)
+        return 0;
+    LogFailure(code);
+    return Fail(code);
+}
+
 }  // namespace
 
 extern "C" int TAVONetDNSSet(const TLIBSZLIST *pServers)
@@ -53,17 +64,6 @@ extern "C" int TAVONetDNSSet(const TLIBSZLIST *pServers)
             }
             text.append("nameserver\t").append(server).append("\n");
         }
-        const tavo::LockHold lock(tavo::kNetworkExclusive, tavo::kNetworkSeconds);
-        if (!lock)
-            return Fail(ERR_LOCK_FAILED);
-        tavo::FileRewrite rewrite;
-        int code = rewrite.Open(kResolver);
-        if (code == 0 || rewrite.IsMissing())
-            code = rewrite.Replace(text, 0644);
-        if (code != 0) {
-            LogFailure(code);
-            return Fail(code);
-        }
-        return 0;
+        return tavo::ChangeNetwork([&] { return Write(text); });
     });
 }

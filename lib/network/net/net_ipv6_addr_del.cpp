@@ -2,12 +2,11 @@
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"
-#include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/interface_name.h"
 #include "network/detail/ipv6_change.h"
-#include "network/detail/network_lock.h"
+#include "network/detail/network_change.h"
 
 namespace {
 
@@ -35,16 +34,15 @@ extern "C" int TAVONetIPv6AddrDel(const char *szInterface, const char *szAddr, i
     if (!address)
         return Fail(ERR_INVALID_NETNAME);
     return Guard([&] {
-        const tavo::LockHold lock(tavo::kNetworkExclusive, tavo::kNetworkSeconds);
-        if (!lock)
-            return Fail(ERR_LOCK_FAILED);
-        if (tavo::RunAddressTool("del", *address, nPrefix, szInterface) != 0)
-            return Fail(ERR_OP_FAILURE);
-        if (const int code = Forget(tavo::InterfaceFile(szInterface), tavo::Ipv6Text(*address))) {
-            LogError("%s:%d Set %s error.", tavo::InterfaceFile(szInterface));
-            Fail(code);
-            return -2;
-        }
-        return 0;
+        return tavo::ChangeNetwork([&] {
+            if (tavo::RunAddressTool("del", *address, nPrefix, szInterface) != 0)
+                return Fail(ERR_OP_FAILURE);
+            if (const int code = Forget(tavo::InterfaceFile(szInterface), tavo::Ipv6Text(*address))) {
+                LogError("%s:%d Set %s error.", tavo::InterfaceFile(szInterface));
+                Fail(code);
+                return -2;
+            }
+            return 0;
+        });
     });
 }

@@ -5,6 +5,7 @@
 #include "core/detail/log.h"
 #include "network/detail/interface_name.h"
 #include "network/detail/ipv6_change.h"
+#include "network/detail/network_change.h"
 #include "network/detail/route_change.h"
 
 extern "C" int TAVONetIPv6RouteAdd(const char *szInterface, const char *szNet, int nPrefix, const char *szGateway)
@@ -19,7 +20,7 @@ extern "C" int TAVONetIPv6RouteAdd(const char *szInterface, const char *szNet, i
     if (!route)
         return Fail(ERR_INVALID_NETNAME);
     return Guard([&] {
-        const int code = tavo::ChangeRoute("add", *route, szInterface);
-        return code == 0 ? 0 : Fail(code);
+        return tavo::ChangeNetwork(
+            [&] { return tavo::RunRouteTool("add", *route, szInterface) == 0 ? 0 : Fail(ERR_OP_FAILURE); });
     });
 }

@@ -3,15 +3,15 @@
 
 #include "core/detail/guard.h"
 #include "core/detail/keep_fault.h"
-#include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
 #include "core/detail/text_fields.h"
 #include "network/detail/bond_files.h"
+#include "network/detail/file_state.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/interface_name.h"
 #include "network/detail/kernel_interface.h"
 #include "network/detail/net_command.h"
-#include "network/detail/network_lock.h"
+#include "network/detail/network_change.h"
 
 #include <cstring>
 
@@ -68,6 +68,41 @@ void AddPhysicalMembers(TAVONETLINKAGGR &aggr)
         TAVONetLinkAggrOptSlsaveAdd(&aggr, std::string(member).c_str());
 }
 
+// 0 or the code of what failed.
+int Rebuild(tavo::BondChange &change, const std::vector<tavo::FileState> &before)
+{
+    tavo::RunNetCommand("/etc/rc.network stop > /dev/null 2>&1");
+    const bool written = change.Apply();
+    if (!written)
+        tavo::PutBackInterfaceFiles(before);
+    const bool started = tavo::RunNetCommand("/etc/rc.network start > /dev/null 2>&1") == 0;
+    if (!written)
+        return ERR_WRITE_FAILED;
+    if (started)
+        return 0;
+    // The network that worked before is worth more than half of a new one.
+    tavo::RunNetCommand("/etc/rc.network stop > /dev/null 2>&1");
+    tavo::PutBackInterfaceFiles(before);
+    tavo::RunNetCommand("/etc/rc.network start > /dev/null 2>&1");
+    return ERR_OP_FAILURE;
+}
+
+int Set(TAVONETLINKAGGR aggr)
+{
+    if (aggr.nMode == TAVO_NET_AGGR_NONE && aggr.fSlaveOption == 0)
+        AddPhysicalMembers(aggr);
+    const std::vector<std::string> members(aggr.rgszMember, aggr.rgszMember + aggr.nMember);
+    const auto before = tavo::ReadInterfaceFiles();
+    if (!before)
+        return Fail(ERR_READ_FAILED);
+    tavo::BondChange change;
+    const bool prepared = change.Prepare(aggr.szBond, static_cast<tavo::BondMode>(aggr.nMode), members);
+    const int code = prepared ? Rebuild(change, *before) : ERR_WRITE_FAILED;
+    if (code == ERR_WRITE_FAILED)
+        LogError("%s:%d Set %s error.", tavo::InterfaceFile(aggr.szBond));
+    return code == 0 ? 0 : Fail(code);
+}
+
 }  // namespace
 
 extern "C" int TAVONetLinkAggrSet(const TAVONETLINKAGGR *pAggr)
@@ -79,26 +114,6 @@ extern "C" int TAVONetLinkAggrSet(const TAVONETLINKAGGR *pAggr)
             return Fail(ERR_LINK_AGGR_TYPE);
         if (IsAsItIs(*pAggr))
             return 0;
-        const tavo::LockHold lock(tavo::kNetworkExclusive, tavo::kNetworkSeconds);
-        if (!lock)
-            return Fail(ERR_LOCK_FAILED);
-        TAVONETLINKAGGR aggr = *pAggr;
-        if (aggr.nMode == TAVO_NET_AGGR_NONE && aggr.fSlaveOption == 0)
-            AddPhysicalMembers(aggr);
-
-        tavo::BondChange change;
-        const std::vector<std::string> members(aggr.rgszMember, aggr.rgszMember + aggr.nMember);
-        bool written = change.Prepare(aggr.szBond, static_cast<tavo::BondMode>(aggr.nMode), members);
-        bool started = true;
-        if (written) {
-            tavo::RunNetCommand("/etc/rc.network stop > /dev/null 2>&1");
-            written = change.Apply();
-            started = tavo::RunNetCommand("/etc/rc.network start > /dev/null 2>&1") == 0;
-        }
-        if (!written) {
-            LogError("%s:%d Set %s error.", tavo::InterfaceFile(aggr.szBond));
-            return Fail(ERR_WRITE_FAILED);
-        }
-        return started ? 0 : Fail(ERR_OP_FAILURE);
+        return tavo::ChangeNetwork([&] { return Set(*pAggr); });
     });
 }

@@ -3,6 +3,7 @@
 
 #include "core/detail/guard.h"
 #include "network/detail/interface_name.h"
+#include "network/detail/network_change.h"
 #include "network/detail/route_change.h"
 
 extern "C" int TAVONetRouteDel(const char *szNet, const char *szMask, const char *szInterface)
@@ -13,7 +14,7 @@ extern "C" int TAVONetRouteDel(const char *szNet, const char *szMask, const char
     if (!route)
         return Fail(ERR_INVALID_NETNAME);
     return Guard([&] {
-        const int code = tavo::ChangeRoute("del", *route, szInterface);
-        return code == 0 ? 0 : Fail(code);
+        return tavo::ChangeNetwork(
+            [&] { return tavo::RunRouteTool("del", *route, szInterface) == 0 ? 0 : Fail(ERR_OP_FAILURE); });
     });
 }

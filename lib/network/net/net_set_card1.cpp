@@ -2,7 +2,6 @@
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"
-#include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
 #include "core/detail/pid_file.h"
 #include "network/detail/connected_route.h"
@@ -11,7 +10,7 @@
 #include "network/detail/interface_name.h"
 #include "network/detail/ipv4_text.h"
 #include "network/detail/net_command.h"
-#include "network/detail/network_lock.h"
+#include "network/detail/network_change.h"
 
 #include <cerrno>
 #include <csignal>
@@ -21,7 +20,6 @@
 
 namespace {
 
-constexpr int kDhcpSeconds = 30;
 constexpr int kKillRounds = 30;  // a client that outlives so many kills hangs in the kernel
 
 int Configure(const char *interface, const tavo::Ipv4 &address, const tavo::Ipv4 &mask)
@@ -31,19 +29,37 @@ int Configure(const char *interface, const tavo::Ipv4 &address, const tavo::Ipv4
                                address.Text(), mask.Text(), broadcast.Text());
 }
 
-// The settings that the interface had before: its file has not been touched by then, or its client noted the lease.
-void Recover(const char *interface)
+// What the interface has before it is changed.
+struct Before {
+    explicit Before(const char *interface)
+        : routes(tavo::LiveRoutes()), dhcp(tavo::ReadSetting(tavo::InterfaceFile(interface), "BOOTPROTO") == "dhcp"),
+          client(tavo::HasDhcpClient(interface))
+    {
+    }
+
+    std::vector<tavo::Route> routes;
+    bool dhcp;
+    bool client;
+    bool cleared = false;  // the old address has been taken away, and with it every route
+};
+
+// Restores the previous address, from the interface file, which is still unchanged, or from the DHCP lease, and the
+// routes and the client that went with it.
+void Recover(const char *interface, const Before &before)
 {
-    const std::string own = tavo::InterfaceFile(interface);
-    const std::string file = tavo::ReadSetting(own, "BOOTPROTO") == "dhcp" ? tavo::DhcpLeaseFile(interface) : own;
+    const std::string file = before.dhcp ? tavo::DhcpLeaseFile(interface) : tavo::InterfaceFile(interface);
     const auto address = tavo::ParseIpv4(tavo::ReadSetting(file, "IPADDR"));
     const auto mask = tavo::ParseIpv4(tavo::ReadSetting(file, "NETMASK"));
     if (address && mask && Configure(interface, *address, *mask) != 0)
         LogError("%s(%d): TAVOIRecoverIPSetting failed.(%X)", ERR_OP_FAILURE);
+    tavo::PutBackRoutes(before.routes, before.cleared ? std::vector<tavo::Route>() : tavo::LiveRoutes(), interface);
+    tavo::RepairRoutes(interface, before.dhcp);
+    if (before.client && !tavo::HasDhcpClient(interface))
+        tavo::StartDhcpClient(interface);
 }
 
 // Ends the client that runs, so that two never fight over one interface.
-bool EndClient(const char *interface)
+bool EndClient(const char *interface, Before &before)
 {
     for (int round = 0; tavo::KillDhcpClient(interface) == tavo::ClientEnd::alive; ++round) {
         if (round == kKillRounds)
@@ -52,6 +68,7 @@ bool EndClient(const char *interface)
         LogError("%s(%d) dhcpcd pid[%d] still exists, wait 1 second.", pid.value_or(0));
         ::sleep(1);
     }
+    before.cleared = true;
     if (tavo::RunNetCommand("/sbin/ifconfig %s 0.0.0.0 > /dev/null 2>&1", interface) != 0)
         LogError("%s:%d Initial setting interface [%s] error %s", interface, std::strerror(errno));
     ::sleep(1);
@@ -59,15 +76,15 @@ bool EndClient(const char *interface)
     return true;
 }
 
-int UseDhcp(const char *interface)
+int UseDhcp(const char *interface, Before &before)
 {
-    if (!EndClient(interface)) {
-        Recover(interface);
+    if (!EndClient(interface, before)) {
+        Recover(interface, before);
         return Fail(ERR_OP_FAILURE);
     }
-    if (tavo::RunNetCommand("/sbin/dhcpcd -n %s -t %d > /dev/null 2>&1", interface, kDhcpSeconds) != 0) {
+    if (tavo::RunNetCommand("/sbin/dhcpcd -n %s -t %d > /dev/null 2>&1", interface, tavo::kDhcpSeconds) != 0) {
         LogError("%s(%d) run dhcpcd error %s", std::strerror(errno));
-        Recover(interface);
+        Recover(interface, before);
         return Fail(ERR_OP_FAILURE);
     }
     const tavo::SettingChange changes[] = {
@@ -101,17 +118,19 @@ void TellDynamicDns()
              told == tavo::PidSignal::failed ? "failed" : "");
 }
 
-int UseStatic(const TAVONETCARD &card, const TAVONETCARD *previous)
+int UseStatic(const TAVONETCARD &card, const TAVONETCARD *previous, Before &before)
 {
     const char *const interface = card.szInterface;
     const tavo::Ipv4 address = *tavo::ParseIpv4(card.szIp);
     const tavo::Ipv4 mask = *tavo::ParseIpv4(card.szMask);
 
     // A client that still renews its lease would take the address away again.
-    if (tavo::ReadPidFile(tavo::DhcpPidFile(interface).c_str()).value_or(0) > 0 && !EndClient(interface))
+    if (tavo::ReadPidFile(tavo::DhcpPidFile(interface).c_str()).value_or(0) > 0 && !EndClient(interface, before)) {
+        Recover(interface, before);
         return Fail(ERR_OP_FAILURE);
+    }
     if (Configure(interface, address, mask) != 0) {
-        Recover(interface);
+        Recover(interface, before);
         return Fail(ERR_OP_FAILURE);
     }
     const tavo::SettingChange changes[] = {
@@ -152,12 +171,13 @@ extern "C" int TAVONetSetCard1(const TAVONETCARD *pCard, const TAVONETCARD *pPre
             return Fail(ERR_INVALID_NETNAME);
     }
     return Guard([&] {
-        const tavo::LockHold lock(tavo::kNetworkExclusive, tavo::kNetworkSeconds);
-        if (!lock)
-            return Fail(ERR_LOCK_FAILED);
-        const int result = card.nMode == TAVO_NET_DHCP ? UseDhcp(card.szInterface) : UseStatic(card, pPrevious);
-        if (result == 0)
-            tavo::RepairRoutes();
-        return result;
+        return tavo::ChangeNetwork([&] {
+            const bool dhcp = card.nMode == TAVO_NET_DHCP;
+            Before before(card.szInterface);
+            const int result = dhcp ? UseDhcp(card.szInterface, before) : UseStatic(card, pPrevious, before);
+            if (result != -1)
+                tavo::RepairRoutes(card.szInterface, dhcp);
+            return result;
+        });
     });
 }

@@ -6,17 +6,19 @@
 #include "network/detail/interface_name.h"
 #include "network/detail/mtu_setting.h"
 #include "network/detail/net_command.h"
+#include "network/detail/network_change.h"
 
 extern "C" int TAVONetSetMTUEth(const char *szInterface, int mtu)
 {
-    if (!szInterface || !tavo::IsInterfaceName(szInterface) || mtu < tavo::kMtuLeast || mtu > tavo::kMtuMost)
+    if (!szInterface || !tavo::IsInterfaceName(szInterface) || !tavo::IsMtu(mtu))
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        if (tavo::RunNetCommand("/sbin/ifconfig %s mtu %d > /dev/null 2>&1", szInterface, mtu) != 0) {
-            const int code = Fail(ERR_OP_FAILURE);
+        return tavo::ChangeNetwork([&] {
+            if (tavo::RunNetCommand("/sbin/ifconfig %s mtu %d > /dev/null 2>&1", szInterface, mtu) == 0)
+                return 0;
+            const int failed = Fail(ERR_OP_FAILURE);
             LogError("%s:%d Failed to ifconfig MTU Value(0x%04X)", TLIBErrGet());
-            return code;
-        }
-        return 0;
+            return failed;
+        });
     });
 }

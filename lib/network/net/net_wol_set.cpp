@@ -9,7 +9,7 @@
 #include "core/detail/open_file.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/interface_name.h"
-#include "network/detail/network_lock.h"
+#include "network/detail/network_change.h"
 #include "network/detail/wake_on_lan.h"
 
 namespace {
@@ -17,11 +17,15 @@ namespace {
 constexpr const char *kSettings = "/etc/tavoinfo.conf";
 constexpr const char *kPanel = "/dev/ttyS1";
 
-// Written as `echo "l"` does, but never waiting for the line, and never made this process's terminal.
-bool TellPanel()
+// Written as `echo "l"` does, but never made this process's terminal. 0 or a code. Other programs talk to the panel, too,
+// and a line is one message.
+int TellPanel()
 {
+    const tavo::LockHold line(TAVO_LOCK_TTYS1 | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING, 5);
+    if (!line)
+        return ERR_LOCK_FAILED;
     const tavo::Fd panel = tavo::OpenFd(kPanel, O_WRONLY | O_NOFOLLOW);
-    return panel && tavo::WriteAll(panel.Get(), "l\n");
+    return panel && tavo::WriteAll(panel.Get(), "l\n") ? 0 : ERR_OP_FAILURE;
 }
 
 // 0 or a code. The card forgets when the power goes, so that the start-up scripts need the options, too.
@@ -70,18 +74,17 @@ extern "C" int TAVONetWolSet(const char *szInterface, int fEnable)
             LogError("%s:%d Miss wake-on-lan enable options.");
             return Fail(options.empty() ? ERR_KEY_NOT_FOUND : ERR_FORMAT_ERROR);
         }
-        const tavo::LockHold lock(tavo::kNetworkExclusive, tavo::kNetworkSeconds);
-        if (!lock)
-            return Fail(ERR_LOCK_FAILED);
-        if (tavo::IsWokenByPanel()) {
-            if (!fEnable)
-                return Fail(ERR_OP_UNREGISTERED);  // the controller knows no word for it
-            if (!TellPanel())
+        return tavo::ChangeNetwork([&] {
+            if (tavo::IsWokenByPanel()) {
+                if (!fEnable)
+                    return Fail(ERR_OP_UNREGISTERED);  // the controller knows no word for it
+                if (const int code = TellPanel())
+                    return Fail(code);
+            } else if (!TellCard(szInterface, *bits)) {
                 return Fail(ERR_OP_FAILURE);
-        } else if (!TellCard(szInterface, *bits)) {
-            return Fail(ERR_OP_FAILURE);
-        }
-        const int code = Store(szInterface, options);
-        return code == 0 ? 0 : Fail(code);
+            }
+            const int code = Store(szInterface, options);
+            return code == 0 ? 0 : Fail(code);
+        });
     });
 }

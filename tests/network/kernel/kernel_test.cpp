@@ -14,6 +14,8 @@
 #include <filesystem>
 #include <optional>
 
+#include <arpa/inet.h>
+#include <netdb.h>
 #include <netinet/in.h>
 #include <sys/socket.h>
 #include <sys/utsname.h>
@@ -66,6 +68,54 @@ std::string LiveGateway()
 {
     char text[20] = "";
     return TAVONetDefaultGatewayGet(text, sizeof text) == 0 ? text : "none";
+}
+
+// What the C library finds under the appliance's own name.
+std::string OwnAddress()
+{
+    char name[256] = "";
+    ::gethostname(name, sizeof name - 1);
+    addrinfo hints{};
+    hints.ai_family = AF_INET;
+    addrinfo *found = nullptr;
+    if (::getaddrinfo(name, nullptr, &hints, &found) != 0)
+        return "none";
+    sockaddr_in address;
+    std::memcpy(&address, found->ai_addr, sizeof address);
+    ::freeaddrinfo(found);
+    return ::inet_ntoa(address.sin_addr);
+}
+
+TEST_F(Kernel, KnowsItsOwnNameAtAnyTime)
+{
+    EXPECT_TRUE(here_->Run([] {
+        EXPECT_EQ(TAVOLnxSetHostname("attic"), 0);
+        EXPECT_EQ(OwnAddress(), "127.0.1.1") << "no card has an address yet";
+        for (const char *address : {"192.0.2.5", "192.0.2.60"}) {
+            const TAVONETCARD card = Card(TAVO_NET_STATIC, address, "255.255.255.0");
+            EXPECT_EQ(TAVONetSetCard1(&card, nullptr), 0);
+            EXPECT_EQ(OwnAddress(), address);
+        }
+        EXPECT_EQ(TAVOLnxSetHostname("cellar"), 0);
+        EXPECT_EQ(OwnAddress(), "192.0.2.60");
+        EXPECT_EQ(test::ShellStatus("ifconfig eth0 0.0.0.0"), 0);
+        EXPECT_EQ(TAVONetHostsRefresh(), 0) << "as the hook of a client that has lost its lease does";
+        EXPECT_EQ(OwnAddress(), "127.0.1.1");
+        return true;
+    }));
+}
+
+TEST_F(Kernel, StoresNoMtuThatTheCardRefuses)
+{
+    EXPECT_TRUE(here_->Run([] {
+        EXPECT_EQ(TAVONetSetMTUValue("eth0", 1400), 0);
+        EXPECT_EQ(TAVONetSetMTUValue("eth0", 65535 + 1), -1);
+        EXPECT_EQ(TAVONetSetMTUValue("eth8", 9000), -1) << "no such card";
+        EXPECT_EQ(TLIBErrGet(), ERR_OP_FAILURE);
+        EXPECT_EQ(TAVOGetMTUSetting("eth8"), 1500);
+        EXPECT_EQ(TAVOGetMTUSetting("eth0"), 1400);
+        return true;
+    }));
 }
 
 TEST_F(Kernel, HasTheAddressAndTheRoutesThatWereSet)
@@ -158,7 +208,9 @@ TEST_F(Kernel, SpeaksIPv6AsItWasTold)
         EXPECT_EQ(TAVONetIPv6Set("eth0", 0), 0);
         EXPECT_EQ(BlTAVONetIPv6IsEnabled("eth0"), 0);
         EXPECT_EQ(addresses(), std::vector<std::string>());
+        testing::internal::CaptureStderr();
         EXPECT_EQ(TAVONetIPv6Set("eth7", 0), -1);
+        EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
         EXPECT_EQ(BlTAVONetIPv6IsEnabled("eth7"), 0);
         EXPECT_EQ(TLIBErrGet(), ERR_OPEN_FAILED);
         return true;
@@ -203,6 +255,7 @@ cat >/tmp/lease <<'END'
 #!/bin/sh
 [ "$1" = bound ] || exit 0
 busybox ifconfig $interface $ip netmask $subnet
+[ ! "$router" ] || busybox route add default gw $router
 printf 'IPADDR=%s\nNETMASK=%s\n' $ip $subnet >/etc/dhcpc/dhcpcd-$interface.info
 END
 chmod 755 /tmp/lease
@@ -234,11 +287,14 @@ TEST_F(Kernel, GetsALeaseFromAServer)
         EXPECT_EQ(TAVONetGetCard1(&card), 0);
         EXPECT_STREQ(card.szIp, "192.0.2.20");
         EXPECT_EQ(ReadFile(kIfcfg), before);
+        EXPECT_EQ(LiveGateway(), "192.0.2.99") << "a manager beyond the router is not locked out";
+        EXPECT_EQ(OwnAddress(), "192.0.2.20");
         return true;
     }));
     ASSERT_EQ(there_->Shell("mkdir -p /var/lib/misc; touch /tmp/leases; printf 'start 192.0.2.40\\nend 192.0.2.40\\n"
                             "interface eth0\\nlease_file /tmp/leases\\npidfile /tmp/udhcpd.pid\\n"
-                            "opt subnet 255.255.255.0\\n' >/tmp/udhcpd.conf; busybox udhcpd /tmp/udhcpd.conf"),
+                            "opt subnet 255.255.255.0\\n' >/tmp/udhcpd.conf; cp /tmp/udhcpd.conf /tmp/router.conf; "
+                            "echo 'opt router 192.0.2.98' >>/tmp/router.conf; busybox udhcpd /tmp/udhcpd.conf"),
               0);
     EXPECT_TRUE(here_->Run([] {
         EXPECT_EQ(TAVONetDhcpTest("eth0", 3), 0);
@@ -251,7 +307,21 @@ TEST_F(Kernel, GetsALeaseFromAServer)
         EXPECT_EQ(card.nMode, TAVO_NET_DHCP);
         EXPECT_STREQ(card.szIp, "192.0.2.40");
         EXPECT_EQ(BlTAVOLnxIsDHCP("eth0"), 1);
-        EXPECT_EQ(LiveGateway(), "192.0.2.99") << "the stored one is back";
+        EXPECT_EQ(LiveGateway(), "192.0.2.99") << "the lease has none, so the stored one is back";
+        EXPECT_EQ(OwnAddress(), "192.0.2.40");
+        return true;
+    }));
+    ASSERT_EQ(there_->Shell("kill $(cat /tmp/udhcpd.pid); sleep 0.3; busybox udhcpd /tmp/router.conf"), 0);
+    EXPECT_TRUE(here_->Run([] {
+        const TAVONETCARD lease = Card(TAVO_NET_DHCP);
+        const TAVONETCARD fixed = Card(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0");
+        EXPECT_EQ(TAVONetSetCard1(&fixed, nullptr), 0);
+        EXPECT_EQ(TAVONetSetCard1(&lease, nullptr), 0);
+        EXPECT_EQ(LiveGateway(), "192.0.2.98") << "the lease's own";
+        EXPECT_EQ(test::ShellStatus("[ $(grep -c '^eth0.00000000' /proc/net/route) = 1 ]"), 0);
+        EXPECT_EQ(TAVONetSetCard1(&fixed, nullptr), 0);
+        EXPECT_EQ(LiveGateway(), "192.0.2.99") << "and the way back";
+        EXPECT_EQ(OwnAddress(), "192.0.2.20");
         return true;
     }));
 }

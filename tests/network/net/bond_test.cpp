@@ -177,11 +177,13 @@ TEST_F(Bond, WhatCannotBeWrittenIsPutBack)
     }
 }
 
-TEST_F(Bond, ANetworkThatDoesNotStartIsSaidSo)
+TEST_F(Bond, ANetworkThatDoesNotStartIsPutBack)
 {
     WriteFile("/var/standin/rc.network.status", "1");
     EXPECT_EQ(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}), -1);
     EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_link_aggr_set"}));
+    EXPECT_EQ(NetworkCalls(), std::string(kStopStart) + kStopStart) << "the old one is started";
+    EXPECT_EQ(Files(), kPlainFiles);
 }
 
 // Each interface stands alone, or belongs to a bond that has a file; none is half a file.

@@ -2,6 +2,7 @@
 #include "tavo_net.h"
 
 #include "cards.h"
+#include "network/lock_holder.h"
 #include "network/named_process.h"
 #include "support/container_text.h"
 #include "support/hostile_names.h"
@@ -239,6 +240,11 @@ TEST_F(NetIPv6, ThePanelIsToldOnlyOnModelsThatHaveOne)
     EXPECT_EQ(TAVONetWolGet("eth0"), 1);
     EXPECT_EQ(TAVONetWolSet("eth0", 0), -1);
     EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_UNREGISTERED, "net_wol_set"}));
+    {
+        const test::LockHolder other(TAVO_LOCK_TTYS1 | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING);
+        EXPECT_EQ(TAVONetWolSet("eth0", 1), -1) << "somebody else is writing to the panel";
+        EXPECT_EQ(TLIBErrGet(), ERR_LOCK_FAILED);
+    }
     tree_.Remove("/dev/ttyS1");
     EXPECT_EQ(TAVONetWolSet("eth0", 1), -1);
     EXPECT_EQ(TLIBErrGet(), ERR_OP_FAILURE);

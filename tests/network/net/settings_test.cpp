@@ -3,6 +3,7 @@
 
 #include "cards.h"
 #include "network/card_record.h"
+#include "network/lock_holder.h"
 #include "network/named_process.h"
 #include "support/container_text.h"
 #include "support/hostile_names.h"
@@ -27,6 +28,7 @@ using test::Quiet;
 using test::ReadFile;
 using test::WriteFile;
 using testing::AllOf;
+using testing::Contains;
 using testing::Each;
 using testing::ElementsAre;
 using testing::EndsWith;
@@ -38,6 +40,7 @@ namespace {
 
 bool unkillable = false;
 std::string named_host;
+bool refuses_name = false;
 
 class NetSettings : public Cards {
   protected:
@@ -125,8 +128,10 @@ TEST_F(NetSettings, WithoutALeaseTheOldAddressComesBack)
     const TAVONETCARD card = Card(TAVO_NET_DHCP);
     EXPECT_EQ(TAVONetSetCard1(&card, nullptr), -1);
     EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_set_card1"}));
-    EXPECT_EQ(commands_.Commands().back(),
-              Quiet("/sbin/ifconfig eth0 192.0.2.10 netmask 255.255.255.0 broadcast 192.0.2.255"));
+    EXPECT_THAT(commands_.Commands(),
+                ElementsAre(HasSubstr("0.0.0.0"), HasSubstr("dhcpcd"),
+                            Quiet("/sbin/ifconfig eth0 192.0.2.10 netmask 255.255.255.0 broadcast 192.0.2.255"),
+                            Quiet("/sbin/route add default gw 192.0.2.1")));
     EXPECT_EQ(ReadFile(kIfcfg), before);
     EXPECT_THAT(log_.Texts(), ElementsAre(MatchesRegex("net_set_card1\\([0-9]+\\) run dhcpcd error .*")));
 
@@ -137,8 +142,8 @@ TEST_F(NetSettings, WithoutALeaseTheOldAddressComesBack)
     log_.Clear();
     commands_.Clear();
     EXPECT_EQ(TAVONetSetCard1(&card, nullptr), -1);
-    EXPECT_EQ(commands_.Commands().back(),
-              Quiet("/sbin/ifconfig eth0 192.0.2.77 netmask 255.255.0.0 broadcast 192.0.255.255"));
+    EXPECT_THAT(commands_.Commands(),
+                Contains(Quiet("/sbin/ifconfig eth0 192.0.2.77 netmask 255.255.0.0 broadcast 192.0.255.255")));
     EXPECT_THAT(log_.Texts(),
                 ElementsAre(MatchesRegex("net_set_card1:[0-9]+ Initial setting interface \\[eth0\\] error .*"),
                             HasSubstr("run dhcpcd error"),
@@ -162,6 +167,53 @@ TEST_F(NetSettings, ARunningClientIsKilledFirst)
     EXPECT_EQ(client.End(), SIGKILL);
     EXPECT_FALSE(std::filesystem::exists(Client::kPidFile));
     EXPECT_THAT(log_.Texts(), IsEmpty());
+}
+
+TEST_F(NetSettings, AClientThatEndedForNothingIsStartedAgain)
+{
+    WriteFile(kIfcfg, "DEVICE=eth0\nBOOTPROTO=dhcp\n");
+    WriteFile("/etc/dhcpc/dhcpcd-eth0.info", "IPADDR=192.0.2.77\nNETMASK=255.255.255.0\nGATEWAY=192.0.2.3\n");
+    SetRoutes("eth0\t000200C0\t00000000\t0001\t0\t0\t0\t00FFFFFF\t0\t0\t0\n");
+    Client client("dhcpcd");
+    Fails("/sbin/ifconfig eth0 192.0.2.20");
+    const TAVONETCARD card = Card(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0");
+    EXPECT_EQ(TAVONetSetCard1(&card, nullptr), -1);
+    EXPECT_THAT(commands_.Commands(),
+                ElementsAre(Quiet("/sbin/ifconfig eth0 0.0.0.0"), HasSubstr("192.0.2.20"),
+                            Quiet("/sbin/ifconfig eth0 192.0.2.77 netmask 255.255.255.0 broadcast 192.0.2.255"),
+                            Quiet("/sbin/route add default gw 192.0.2.3"), Quiet("/sbin/dhcpcd -n eth0 -t 30") + " &"));
+    EXPECT_EQ(client.End(), SIGKILL);
+    std::filesystem::remove("/etc/dhcpc/dhcpcd-eth0.info");
+}
+
+// The gateway that is stored belongs to a static address.
+TEST_F(NetSettings, WithDhcpTheClientNamesTheGateway)
+{
+    const std::string connected = "eth0\t000200C0\t00000000\t0001\t0\t0\t0\t00FFFFFF\t0\t0\t0\n";
+    const struct {
+        const char *live, *leased, *added;
+    } rows[] = {
+        {"FE0200C0", "", ""},                // the client has set one
+        {"", "", "192.0.2.1"},               // it has none to set
+        {"", "192.0.2.254", "192.0.2.254"},  // it has noted one
+        {"FE0200C0", "192.0.2.254", ""},
+    };
+    for (const auto &row : rows) {
+        SetRoutes(connected + (*row.live
+                                   ? "eth0\t00000000\t" + std::string(row.live) + "\t0003\t0\t0\t0\t00000000\t0\t0\t0\n"
+                                   : ""));
+        WriteFile("/etc/dhcpc/dhcpcd-eth0.info", std::string("IPADDR=192.0.2.77\n") +
+                                                     (*row.leased ? "GATEWAY=" + std::string(row.leased) + "\n" : ""));
+        commands_.Clear();
+        const TAVONETCARD card = Card(TAVO_NET_DHCP);
+        EXPECT_EQ(TAVONetSetCard1(&card, nullptr), 0);
+        EXPECT_EQ(commands_.Commands().size(), *row.added ? 3u : 2u) << row.live << row.leased;
+        if (*row.added) {
+            EXPECT_EQ(commands_.Commands().back(), Quiet(std::string("/sbin/route add default gw ") + row.added));
+        }
+        EXPECT_THAT(ReadFile("/etc/sysconfig/network"), HasSubstr("GATEWAY=192.0.2.1\n")) << "for the way back";
+    }
+    std::filesystem::remove("/etc/dhcpc/dhcpcd-eth0.info");
 }
 
 TEST_F(NetSettings, AProcessThatGotTheClientsOldNumberLives)
@@ -297,6 +349,76 @@ TEST_F(NetSettings, TheHostNameKeepsTheAdministratorsLines)
     EXPECT_STREQ(name, "attic");
 }
 
+// The line of the appliance's own name, in every state of its addresses.
+TEST_F(NetSettings, HostsHasTheNameAtTheFirstAddress)
+{
+    const auto hosts = [] {
+        return ReadFile("/etc/hosts");
+    };
+    const std::string rest = "# printers\n192.0.2.50\tlp lp.local\n";
+    WriteFile("/etc/hosts", "127.0.0.1 localhost\n10.0.0.5 tavo\n" + rest);
+    EXPECT_EQ(TAVONetHostsRefresh(), 0);
+    EXPECT_EQ(hosts(), "127.0.0.1\tlocalhost\n192.0.2.10\ttavo\n" + rest);
+
+    addresses_.clear();
+    EXPECT_EQ(TAVOLnxSetHostname("attic"), 0);
+    EXPECT_EQ(hosts(), "127.0.0.1\tlocalhost\n127.0.1.1\tattic\n" + rest) << "no card has an address";
+
+    // Any change of the network finds what has changed meanwhile, and so does who only held up the client's hook.
+    addresses_["eth0"] = {"192.0.2.60", "255.255.255.0"};
+    EXPECT_EQ(TAVONetRouteAdd("10.20.0.0", "255.255.0.0", "eth0"), 0);
+    EXPECT_EQ(hosts(), "127.0.0.1\tlocalhost\n192.0.2.60\tattic\n" + rest);
+    addresses_["eth0"].first = "192.0.2.61";
+    BlTAVOLnxIsDHCP("eth0");
+    EXPECT_EQ(hosts(), "127.0.0.1\tlocalhost\n192.0.2.61\tattic\n" + rest);
+
+    // Without a stored name the kernel's counts.
+    WriteFile("/etc/sysconfig/network", "GATEWAY=192.0.2.1\n");
+    char own[256] = "";
+    ::gethostname(own, sizeof own - 1);
+    EXPECT_EQ(TAVONetHostsRefresh(), 0);
+    EXPECT_THAT(hosts(), HasSubstr("192.0.2.61\t" + std::string(own) + "\n"));
+    const auto written = std::filesystem::last_write_time("/etc/hosts");
+    EXPECT_EQ(TAVONetHostsRefresh(), 0);
+    EXPECT_EQ(std::filesystem::last_write_time("/etc/hosts"), written) << "a file that is true stays";
+}
+
+TEST_F(NetSettings, TheClientsHookNeverWaits)
+{
+    WriteFile("/etc/hosts", "127.0.0.1\tlocalhost\n10.0.0.5\ttavo\n");
+    {
+        const test::LockHolder other(0x106);
+        EXPECT_EQ(TAVONetHostsRefresh(), 1);
+        EXPECT_EQ(ReadFile("/etc/hosts"), "127.0.0.1\tlocalhost\n10.0.0.5\ttavo\n");
+    }
+    EXPECT_EQ(TAVONetHostsRefresh(), 0);
+    EXPECT_EQ(ReadFile("/etc/hosts"), "127.0.0.1\tlocalhost\n192.0.2.10\ttavo\n");
+}
+
+TEST_F(NetSettings, AHostsFileThatCannotBeWrittenFailsTheNameAlone)
+{
+    std::filesystem::remove("/etc/hosts");
+    std::filesystem::create_directory("/etc/hosts");
+    EXPECT_EQ(TAVONetDefaultGatewaySet("192.0.2.254"), 0);
+    EXPECT_THAT(log_.Texts(), ElementsAre(MatchesRegex("net_default_gateway_set:[0-9]+ Set /etc/hosts error.")));
+    named_host.clear();
+    EXPECT_EQ(TAVOLnxSetHostname("attic"), -1);
+    EXPECT_EQ(ReadFile("/etc/sysconfig/network"), "GATEWAY=192.0.2.254\nHOSTNAME=tavo\n");
+    EXPECT_EQ(named_host, "");
+    std::filesystem::remove("/etc/hosts");
+}
+
+TEST_F(NetSettings, ANameThatTheKernelRefusesIsNotStored)
+{
+    WriteFile("/etc/hosts", "");
+    refuses_name = true;
+    EXPECT_EQ(TAVOLnxSetHostname("attic"), -1);
+    refuses_name = false;
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_SYS_UNKNOWN, "lnx_set_hostname"}));
+    EXPECT_EQ(ReadFile("/etc/sysconfig/network"), "GATEWAY=192.0.2.1\nHOSTNAME=tavo\n");
+    EXPECT_EQ(ReadFile("/etc/hosts"), "127.0.0.1\tlocalhost\n192.0.2.10\ttavo\n");
+}
+
 TEST_F(NetSettings, TheMtuHasAKeyForEachInterface)
 {
     WriteFile("/etc/tavoinfo.conf", "eth1_mtu=\"4000\"\nrunsamba=\"yes\"\n");
@@ -315,6 +437,14 @@ TEST_F(NetSettings, TheMtuHasAKeyForEachInterface)
     Fails("/sbin/ifconfig");
     EXPECT_EQ(TAVONetSetMTUEth("eth0", 1400), -1);
     EXPECT_THAT(log_.Texts(), ElementsAre(EndsWith("Failed to ifconfig MTU Value(0x2A00)")));
+    EXPECT_EQ(TAVONetSetMTUValue("eth0", 1400), -1);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_set_mtu_eth"}));
+    EXPECT_EQ(TAVOGetMTUSetting("eth0"), 9000) << "what the card refuses is not stored";
+    {
+        const test::LockHolder other(0x106);
+        EXPECT_EQ(TAVONetSetMTUEth("eth0", 1400), -1);
+        EXPECT_EQ(TLIBErrGet(), ERR_LOCK_FAILED);
+    }
     for (const int bad : {-1, 0, 67, 65536})
         EXPECT_EQ(TAVONetSetMTUValue("eth0", bad), -1) << bad;
     EXPECT_EQ(TAVOGetMTUSetting("eth0"), 9000);
@@ -479,6 +609,10 @@ extern "C" {
 
 int sethostname(const char *name, size_t length) noexcept
 {
+    if (refuses_name) {
+        errno = EPERM;
+        return -1;
+    }
     named_host.assign(name, length);
     return 0;
 }
