@@ -30,8 +30,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t *data, size_t size)
     Check(std::memcmp(&host, &again, sizeof host) == 0, "and says the same");
 
     findhostd::HostTable table;
-    Check(table.Put(host, 0) && !table.Put(host, 0), "put once");
-    std::string line = table.Text();
+    Check(table.Put(host, 0, 1000) && !table.Put(host, 0, 1000), "put once");
+    std::string line = table.Text(1000);
     Check(line.find('\n') == line.size() - 1, "one line");
     line.pop_back();
     const tavo::HostLine read = tavo::ParseHostLine(line);

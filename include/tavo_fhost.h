@@ -37,8 +37,10 @@ TAVO_API uint32_t ErrFHOSTSendQueryPkt(void);
 /* Collects the hosts on the network: starts findhostd when it does not run (3 s more), sends the query, waits 10 s for
  * the answers, and moves the list to /tmp/tavods.list.tmp for TAVOFHOSTGet2Hash. Two callers at the same time take each
  * other's list.
- * Returns 0, or -1 when the daemon does not start, an interface could not send, or the list cannot be made or moved.
- * What somebody else left in the list's place is removed first. */
+ * The daemon counts as running when a process of root holds the lock of its pid file.
+ * Returns 0, or -1 with ERR_OP_FAILURE (the daemon does not start, or an interface could not send), ERR_CREATE_FAILED or
+ * ERR_RENAME_FAILED (the list cannot be made or moved). What somebody else left in the list's place is removed first; a
+ * folder is moved out of the way. */
 TAVO_API int TAVOFHOSTDumpHost(void);
 
 /* Reads the collected list into the caller's hash *ppshHosts, which may move: a key "NAME(ADDRESS)" with the value
@@ -47,6 +49,26 @@ TAVO_API int TAVOFHOSTDumpHost(void);
  * Returns the number of pairs in the hash, 0 with ERR_OPEN_FAILED when there is no list (or what stands there is not
  * ours), or -1 with ERR_BAD_PARAMETERS (NULL), ERR_READ_FAILED or ERR_OUT_OF_MEMORY. */
 TAVO_API int TAVOFHOSTGet2Hash(TLIBSZHASH **ppshHosts);
+
+/* An appliance as it describes itself; nothing of it but the address is to be trusted. */
+typedef struct TAVOFHOST {
+    uint32_t nModel;
+    uint32_t nProtocol;   /* 240 or more */
+    char szName[256];     /* not empty; findhostd lists UTF-8 text without control characters, at most 63 bytes */
+    char szIp[20];        /* dotted quad, on the network of szInterface */
+    char szInterface[20]; /* on which the answer came */
+} TAVOFHOST;
+
+/* Gets a host, which is valid during the call, and the caller's own pointer. A result other than 0 ends the search. */
+typedef int (*TAVOFHOSTCALLBACK)(const TAVOFHOST *pHost, void *pContext);
+
+/* Asks the network for appliances as TAVOFHOSTDumpHost does, and hands each to the callback once, at most a second after
+ * findhostd has listed it. It watches for cSeconds (10 are enough for a quiet network) and takes the list from nobody, so
+ * that any number of callers can search at the same time. Hosts that have answered another query in the last 15 s are
+ * among those that come first.
+ * Returns the number of hosts that were handed over, or -1 with ERR_BAD_PARAMETERS (pfnHost is NULL, cSeconds below 1),
+ * ERR_OP_FAILURE (the daemon does not start, or an interface could not send) or ERR_OUT_OF_MEMORY. */
+TAVO_API int TAVOFHOSTEnum(TAVOFHOSTCALLBACK pfnHost, void *pContext, int cSeconds);
 
 TAVO_END_DECLS
 

@@ -1,4 +1,4 @@
-// The appliances that answered the last query, and the list that is made of them.
+// The appliances that have answered lately, and the list that is made of them.
 #ifndef FINDHOSTD_HOST_TABLE_H
 #define FINDHOSTD_HOST_TABLE_H
 
@@ -9,29 +9,39 @@
 
 namespace findhostd {
 
+// Times are monotonic milliseconds.
 class HostTable {
   public:
-    static constexpr size_t kMost = 256;
+    static constexpr size_t kMost = 1024;          // all addresses of four usual networks
+    static constexpr int64_t kKept = 15000;        // after its last answer a host is listed for so long
+    static constexpr int64_t kCollection = 10000;  // a caller waits for so long, and what it is told stays
 
-    void Clear() noexcept { count_ = 0; }
+    // A query of ours. A new collection begins when the last one is over.
+    void NoteQuery(int64_t now) noexcept;
 
-    // A host that is there already, by its address, is replaced. False when nothing has changed: it was just so, or the
-    // table is full, and whoever came first stays.
-    bool Put(const Host &host, unsigned interface) noexcept;
+    // Within one collection the first answer from an address counts. True when the list has changed: the address is new
+    // to it, or says something else than in the collection before. A full table takes nobody in.
+    bool Put(const Host &host, unsigned interface, int64_t now) noexcept;
 
     size_t Size() const noexcept { return count_; }
 
-    // A line a host: "MODEL,PROTOCOL,NAME,ADDRESS,INTERFACE".
-    std::string Text() const;
+    // A line a host, in the order in which they came: "MODEL,PROTOCOL,NAME,ADDRESS,INTERFACE". Drops who has gone.
+    std::string Text(int64_t now);
 
   private:
     struct Entry {
         Host host;
         unsigned interface;  // as the kernel counts them
+        unsigned collection;
+        int64_t seen;
     };
+
+    void DropOld(int64_t now) noexcept;
 
     std::array<Entry, kMost> entries_;
     size_t count_ = 0;
+    unsigned collection_ = 0;
+    int64_t begun_ = -kCollection;
 };
 
 }  // namespace findhostd

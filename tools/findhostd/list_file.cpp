@@ -14,6 +14,20 @@ namespace {
 
 constexpr const char *kList = "/tmp/tavods.list";
 
+// Somebody's folder in the list's place cannot be replaced by a file; it goes out of the way.
+bool MoveFolderAside()
+{
+    char aside[] = "/tmp/.tavods.aside.XXXXXX";
+    return ::mkdtemp(aside) && std::rename(kList, aside) == 0;
+}
+
+bool PutInPlace(const char *temp)
+{
+    if (std::rename(temp, kList) == 0)
+        return true;
+    return errno == EISDIR && MoveFolderAside() && std::rename(temp, kList) == 0;
+}
+
 bool WriteAll(int fd, std::string_view text)
 {
     while (!text.empty()) {
@@ -37,7 +51,7 @@ bool WriteList(std::string_view text)
     if (fd < 0)
         return false;
     const bool written = WriteAll(fd, text) && ::fchmod(fd, 0644) == 0;
-    const bool done = ::close(fd) == 0 && written && std::rename(temp, kList) == 0;
+    const bool done = ::close(fd) == 0 && written && PutInPlace(temp);
     if (!done) {
         const int error = errno;
         ::unlink(temp);

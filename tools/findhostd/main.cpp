@@ -43,7 +43,18 @@ uint32_t ModelNumber()
     return model ? model : 1;
 }
 
-// The pid file, locked for as long as the daemon lives; -1 with errno, EWOULDBLOCK when another one runs.
+// A caller may have closed its standard streams: what is opened later must not be taken for one.
+void HaveStandardStreams()
+{
+    int fd;
+    do
+        fd = ::open("/dev/null", O_RDWR);
+    while (fd >= 0 && fd < 3);
+    if (fd >= 3)
+        ::close(fd);
+}
+
+// The pid file, locked for as long as the daemon lives; -1 with errno, EWOULDBLOCK when somebody else has it.
 int OpenPidFile()
 {
     const int fd = ::open(kPidFile, O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK, 0644);
@@ -81,9 +92,14 @@ int Detach()
     return ready[1];
 }
 
-void LeaveStandardStreams()
+int OpenNull()
 {
-    const int null = ::open("/dev/null", O_RDWR | O_CLOEXEC);
+    return ::open("/dev/null", O_RDWR | O_CLOEXEC);
+}
+
+// The caller's end with his program; who reads from this one would wait for ever.
+void LeaveStandardStreams(int null)
+{
     for (int fd = 0; fd < 3; ++fd)
         ::dup2(null, fd);
     ::close(null);
@@ -97,10 +113,12 @@ void LeaveStandardStreams()
     ::sigprocmask(SIG_SETMASK, &none, nullptr);
     const uint32_t model = ModelNumber();
     const char done = 0;
+    const int null = OpenNull();
     if (!findhostd::DropPrivileges() || ::prctl(PR_SET_PDEATHSIG, SIGKILL) != 0 || ::getppid() != root_part) {
         Complain("cannot give up the rights of root");
         ::_exit(1);
     }
+    LeaveStandardStreams(null);
     if (::write(report_ready, &done, 1) != 1)
         ::_exit(1);
     ::close(report_ready);
@@ -110,16 +128,20 @@ void LeaveStandardStreams()
 
 int Serve(int verdict)
 {
-    const int pid_file = OpenPidFile();
-    if (pid_file < 0 && errno == EWOULDBLOCK) {
+    int pid_file = OpenPidFile();
+    const bool locked = pid_file < 0 && errno == EWOULDBLOCK;
+    if (pid_file < 0 && !locked)
+        return Complain(kPidFile);
+    const int network = findhostd::OpenNetworkSocket();
+    if (network < 0 && locked) {
         std::fprintf(stderr, "findhostd: it runs already\n");
         return 1;
     }
-    if (pid_file < 0)
-        return Complain(kPidFile);
-    const int network = findhostd::OpenNetworkSocket();
     if (network < 0)
         return Complain("cannot listen on UDP port 9999");
+    // Nobody listens, so it is not a daemon that has the lock, but somebody who may read the file.
+    if (locked && (::unlink(kPidFile) != 0 || (pid_file = OpenPidFile()) < 0))
+        return Complain(kPidFile);
 
     sigset_t asked;
     ::sigemptyset(&asked);
@@ -149,7 +171,7 @@ int Serve(int verdict)
         return 1;
     }
     if (verdict >= 0) {
-        LeaveStandardStreams();
+        LeaveStandardStreams(OpenNull());
         if (::write(verdict, &done, 1) != 1)
             ::syslog(LOG_WARNING, "nobody waits for the daemon");
         ::close(verdict);
@@ -175,6 +197,7 @@ int main(int argc, char **argv)
                      "ours in /tmp/tavods.list.\n");
         return 2;
     }
+    HaveStandardStreams();
     ::umask(022);
     ::openlog("findhostd", LOG_PID, LOG_DAEMON);
     const int verdict = foreground ? -1 : Detach();

@@ -1,6 +1,8 @@
 // The part of the daemon that listens to the network.
 #include "network_part.h"
 
+#include "answer_budget.h"
+#include "clock.h"
 #include "own_addresses.h"
 #include "packet.h"
 #include "report.h"
@@ -8,7 +10,6 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
-#include <ctime>
 
 #include <arpa/inet.h>
 #include <poll.h>
@@ -18,16 +19,7 @@
 namespace findhostd {
 namespace {
 
-constexpr int kAnswersASecond = 50;
-constexpr time_t kCollectSeconds = 15;  // after a query of ours; what comes later, or unasked, is not listed
-constexpr time_t kSameQuery = 3;        // a query goes out twice, and from every interface
-
-time_t Now()
-{
-    timespec now{};
-    ::clock_gettime(CLOCK_MONOTONIC, &now);
-    return now.tv_sec;
-}
+constexpr int64_t kCollect = 15000;  // ms after a query of ours; what comes later, or unasked, is not listed
 
 struct Packet {
     std::array<uint8_t, kLargestPacket + 1> bytes;  // one more than any packet of ours has: too large is seen
@@ -116,8 +108,11 @@ class Listener {
                 Answer(packet);
             break;
         case PacketKind::reply:
-            // Each speaks for itself alone: nobody can put another's address into the list.
-            if (host.address.s_addr == packet.from.s_addr && asked_ >= 0 && Now() - asked_ <= kCollectSeconds)
+            // Each speaks for itself alone: nobody can put another's address into the list, or one from elsewhere.
+            if (host.address.s_addr != packet.from.s_addr || asked_ == 0 || Now() - asked_ > kCollect)
+                break;
+            addresses_.Refresh();
+            if (addresses_.Near(packet.interface, packet.from) && !addresses_.Has(packet.from))
                 Tell({Report::host_found, packet.interface, host});
             break;
         case PacketKind::other:
@@ -128,17 +123,15 @@ class Listener {
   private:
     void NoteOwnQuery()
     {
-        const time_t now = Now();
-        const bool same = asked_ >= 0 && now - asked_ <= kSameQuery;
-        Tell({same ? Report::query_again : Report::query_sent, 0, {}});
-        asked_ = now;
+        asked_ = Now();
+        Tell({Report::query_sent, 0, {}});
     }
 
     void Answer(const Packet &packet)
     {
         // An asker from elsewhere may be a forged address, whom we would flood on somebody's behalf.
         const in_addr *const own = addresses_.Near(packet.interface, packet.from);
-        if (!own || !MayAnswer())
+        if (!own || !budget_.Take(packet.from, Now()))
             return;
         Host self{};
         self.model = model_;
@@ -150,15 +143,6 @@ class Listener {
         Send(network_, {bytes.data(), size}, packet.from, packet.interface, *own);
     }
 
-    bool MayAnswer()
-    {
-        if (const time_t now = Now(); now != second_) {
-            second_ = now;
-            answered_ = 0;
-        }
-        return answered_++ < kAnswersASecond;
-    }
-
     // What the other part has no room for is lost: it is asked again soon.
     void Tell(const Report &report) { ::send(reports_, &report, sizeof report, MSG_DONTWAIT | MSG_NOSIGNAL); }
 
@@ -166,9 +150,8 @@ class Listener {
     int reports_;
     uint32_t model_;
     OwnAddresses addresses_;
-    time_t asked_ = -1;
-    time_t second_ = -1;
-    int answered_ = 0;
+    AnswerBudget budget_;
+    int64_t asked_ = 0;  // never
 };
 
 }  // namespace
@@ -193,8 +176,8 @@ int OpenNetworkSocket()
 
 void ListenToNetwork(int network, int reports, uint32_t model)
 {
-    Listener listener(network, reports, model);
-    Packet packet;
+    static Listener listener(network, reports, model);
+    static Packet packet;
     for (;;) {
         pollfd ends[] = {{network, POLLIN, 0}, {reports, POLLIN, 0}};
         if (::poll(ends, 2, -1) < 0 && errno != EINTR)

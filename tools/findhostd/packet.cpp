@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cstring>
 #include <iterator>
+#include <optional>
 
 namespace findhostd {
 namespace {
@@ -116,6 +117,38 @@ class Writer {
     size_t size_ = 0;
 };
 
+// The next character of UTF-8 text, in its one shortest form; empty where the text is not UTF-8.
+std::optional<char32_t> TakeCharacter(std::string_view &text) noexcept
+{
+    const auto first = static_cast<unsigned char>(text.front());
+    const size_t length = first < 0x80 ? 1 : first >> 5 == 6 ? 2 : first >> 4 == 14 ? 3 : first >> 3 == 30 ? 4 : 0;
+    if (length == 0 || text.size() < length)
+        return std::nullopt;
+    char32_t character = length == 1 ? first : first & (0x7Fu >> length);
+    for (const char byte : text.substr(1, length - 1)) {
+        if ((static_cast<unsigned char>(byte) & 0xC0) != 0x80)
+            return std::nullopt;
+        character = character << 6 | (static_cast<unsigned char>(byte) & 0x3Fu);
+    }
+    constexpr char32_t least[] = {0, 0x80, 0x800, 0x10000};
+    if (character < least[length - 1] || character > 0x10FFFF || (character >= 0xD800 && character <= 0xDFFF))
+        return std::nullopt;
+    text.remove_prefix(length);
+    return character;
+}
+
+// Neither what steers a terminal, nor what turns the direction of the text around it, nor what the list and its readers
+// put around names: commas, and parentheses around the address.
+bool MayBeInName(char32_t character) noexcept
+{
+    if (character < 0x20 || (character >= 0x7F && character <= 0x9F))
+        return false;
+    if ((character >= 0x200E && character <= 0x200F) || (character >= 0x2028 && character <= 0x202E) ||
+        (character >= 0x2066 && character <= 0x2069) || character == 0x061C)
+        return false;
+    return character != ',' && character != '(' && character != ')';
+}
+
 // All records together are far from filling a packet.
 static_assert(sizeof stFHOSTHeader + 3 * 6 + 6 + 2 + kLongestName <= kLargestPacket);
 
@@ -123,11 +156,14 @@ static_assert(sizeof stFHOSTHeader + 3 * 6 + 6 + 2 + kLongestName <= kLargestPac
 
 bool IsHostName(std::string_view name) noexcept
 {
-    return !name.empty() && name.size() <= kLongestName && name.front() != ' ' && name.back() != ' ' &&
-           std::all_of(name.begin(), name.end(), [](char byte) {
-               const auto value = static_cast<unsigned char>(byte);
-               return value >= 0x20 && value != 0x7F && byte != ',';
-           });
+    if (name.empty() || name.size() > kLongestName || name.front() == ' ' || name.back() == ' ')
+        return false;
+    while (!name.empty()) {
+        const auto character = TakeCharacter(name);
+        if (!character || !MayBeInName(*character))
+            return false;
+    }
+    return true;
 }
 
 bool IsSound(const Host &host) noexcept

@@ -25,7 +25,8 @@ struct Host {
     char name[kLongestName + 1];  // ends in a NUL; the bytes behind it are 0
 };
 
-// A name that a line of the list can hold: 1 to 63 bytes, no control characters, no comma, no blank at either end.
+// A name that a line of the list can hold, and that a terminal can show: 1 to 63 bytes of UTF-8 without control
+// characters, marks of direction, line separators, commas and parentheses, and without a blank at either end.
 bool IsHostName(std::string_view name) noexcept;
 
 // What can stand in the list: a model, a protocol of 240 or more, a name, an address that a host can have.

@@ -11,9 +11,8 @@ namespace findhostd {
 
 struct Report {
     enum Kind : uint32_t {
-        query_sent = 1,   // a query of ours: a new list begins
-        query_again = 2,  // the same once more, or another program's soon after: the list may have been taken meanwhile
-        host_found = 3,
+        query_sent = 1,  // a query of ours: its sender wants a list
+        host_found = 2,
     };
 
     uint32_t kind;

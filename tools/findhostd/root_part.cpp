@@ -1,10 +1,13 @@
 // The part of the daemon that keeps the rights of root.
 #include "root_part.h"
 
+#include "clock.h"
 #include "host_table.h"
 #include "list_file.h"
+#include "own_addresses.h"
 #include "report.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <csignal>
 
@@ -20,7 +23,7 @@ namespace {
 enum class Heard { nothing, change, no_change, end };
 
 // One report. The other part may have been taken over by somebody from the network: nothing of it is believed unseen.
-Heard HearOne(int reports, HostTable &table)
+Heard HearOne(int reports, HostTable &table, OwnAddresses &addresses)
 {
     Report report{};
     const ssize_t size = ::recv(reports, &report, sizeof report, MSG_DONTWAIT | MSG_TRUNC);
@@ -30,13 +33,16 @@ Heard HearOne(int reports, HostTable &table)
         return Heard::end;
     if (size != sizeof report)
         return Heard::no_change;
-    if (report.kind == Report::query_sent)
-        table.Clear();
-    if (report.kind == Report::query_sent || report.kind == Report::query_again)
+    if (report.kind == Report::query_sent) {
+        table.NoteQuery(Now());
         return Heard::change;
+    }
     if (report.kind != Report::host_found || !IsSound(report.host))
         return Heard::no_change;
-    return table.Put(report.host, report.interface) ? Heard::change : Heard::no_change;
+    addresses.Refresh();
+    if (!addresses.Near(report.interface, report.host.address))
+        return Heard::no_change;
+    return table.Put(report.host, report.interface, Now()) ? Heard::change : Heard::no_change;
 }
 
 bool IsAskedToEnd(int signals)
@@ -50,23 +56,29 @@ bool IsAskedToEnd(int signals)
 bool KeepList(int reports, int signals)
 {
     static HostTable table;
-    constexpr int together = 64;  // reports that make one list: a flood makes no more than a list for so many
+    static OwnAddresses addresses;
+    constexpr int together = 64;      // reports before the signals are looked at again
+    constexpr int64_t between = 250;  // ms: a flood makes four lists a second
+    bool changed = false;
+    int64_t next = 0;  // list, at the earliest
     for (;;) {
         pollfd ends[] = {{reports, POLLIN, 0}, {signals, POLLIN, 0}};
-        if (::poll(ends, 2, -1) < 0 && errno != EINTR)
+        const int64_t wait = changed ? std::clamp<int64_t>(next - Now(), 0, between) : -1;
+        if (::poll(ends, 2, static_cast<int>(wait)) < 0 && errno != EINTR)
             return false;
         if (ends[1].revents && IsAskedToEnd(signals))
             return true;
-        if (!ends[0].revents)
-            continue;
-        bool changed = false;
-        Heard heard = Heard::no_change;
+        Heard heard = ends[0].revents ? Heard::no_change : Heard::nothing;
         for (int i = 0; i < together && heard != Heard::nothing && heard != Heard::end; ++i) {
-            heard = HearOne(reports, table);
+            heard = HearOne(reports, table, addresses);
             changed = changed || heard == Heard::change;
         }
-        if (changed && !WriteList(table.Text()))
-            ::syslog(LOG_ERR, "cannot write the list of hosts: %m");
+        if (changed && Now() >= next) {
+            changed = false;
+            next = Now() + between;
+            if (!WriteList(table.Text(Now())))
+                ::syslog(LOG_ERR, "cannot write the list of hosts: %m");
+        }
         if (heard == Heard::end)
             return false;
     }

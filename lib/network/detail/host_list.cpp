@@ -2,6 +2,7 @@
 #include "network/detail/host_list.h"
 
 #include "network/detail/ipv4_text.h"
+#include "network/detail/net_buffer.h"
 
 #include <array>
 #include <charconv>
@@ -21,18 +22,28 @@ long LeadingNumber(std::string_view field) noexcept
     return number;
 }
 
-}  // namespace
+using Fields = std::array<std::string_view, kFields>;
 
-HostLine ParseHostLine(std::string_view line) noexcept
+// False when there are fewer; what follows the last one is left out.
+bool Split(std::string_view line, Fields &field) noexcept
 {
-    std::array<std::string_view, kFields> field;
     for (size_t i = 0; i < kFields; ++i) {
         const size_t comma = line.find(',');
         field[i] = line.substr(0, comma);
         if (comma == std::string_view::npos && i + 1 < kFields)
-            return {HostLineKind::too_few_fields, {}, {}};
+            return false;
         line.remove_prefix(comma == std::string_view::npos ? line.size() : comma + 1);
     }
+    return true;
+}
+
+}  // namespace
+
+HostLine ParseHostLine(std::string_view line) noexcept
+{
+    Fields field;
+    if (!Split(line, field))
+        return {HostLineKind::too_few_fields, {}, {}};
     if (LeadingNumber(field[0]) == 0)
         return {HostLineKind::no_model, {}, {}};
     if (LeadingNumber(field[1]) < kLeastProtocol)
@@ -40,6 +51,21 @@ HostLine ParseHostLine(std::string_view line) noexcept
     if (!ParseIpv4(field[3]))
         return {HostLineKind::bad_address, {}, {}};
     return {HostLineKind::host, field[2].substr(0, kLongestName), field[3]};
+}
+
+std::optional<TAVOFHOST> ParseHost(std::string_view line) noexcept
+{
+    Fields field;
+    if (ParseHostLine(line).kind != HostLineKind::host || !Split(line, field))
+        return std::nullopt;
+    TAVOFHOST host = {};
+    host.nModel = static_cast<uint32_t>(LeadingNumber(field[0]));
+    host.nProtocol = static_cast<uint32_t>(LeadingNumber(field[1]));
+    if (field[2].empty() || !ToBuffer(field[2], host.szName, sizeof host.szName) ||
+        !ToBuffer(field[3], host.szIp, sizeof host.szIp) ||
+        !ToBuffer(field[4], host.szInterface, sizeof host.szInterface))
+        return std::nullopt;
+    return host;
 }
 
 }  // namespace tavo

@@ -2,6 +2,9 @@
 #ifndef TAVO_NETWORK_DETAIL_HOST_LIST_H
 #define TAVO_NETWORK_DETAIL_HOST_LIST_H
 
+#include "tavo_fhost.h"
+
+#include <optional>
 #include <string_view>
 
 namespace tavo {
@@ -16,6 +19,9 @@ struct HostLine {
     std::string_view name;
     std::string_view address;
 };
+
+// The same of a host as a record; empty for any other line.
+std::optional<TAVOFHOST> ParseHost(std::string_view line) noexcept;
 
 // "MODEL,PROTOCOL,NAME,ADDRESS,..." without white space around it. Names are cut at 255 bytes.
 HostLine ParseHostLine(std::string_view line) noexcept;

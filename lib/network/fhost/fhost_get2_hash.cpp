@@ -5,23 +5,14 @@
 #include "core/detail/key_value_line.h"
 #include "core/detail/line_reader.h"
 #include "core/detail/log.h"
-#include "core/detail/open_file.h"
+#include "network/detail/discovery_daemon.h"
 #include "network/detail/host_list.h"
 
 #include <string>
 
-namespace {
+#include <unistd.h>
 
-// The list lies where everybody may put one, so only a regular file of root or the caller is read. Of the daemon it is
-// the part that keeps root's rights that writes the list; the part that listens to the network has none and only tells it.
-tavo::Fd OpenList()
-{
-    tavo::Fd fd = tavo::OpenRegular(tavo::kHostListTaken, O_RDONLY | O_NOFOLLOW);
-    struct stat st;
-    if (fd && (::fstat(fd.Get(), &st) != 0 || (st.st_uid != 0 && st.st_uid != ::geteuid())))
-        fd.Reset();
-    return fd;
-}
+namespace {
 
 class DeleteList {
   public:
@@ -46,7 +37,7 @@ extern "C" int TAVOFHOSTGet2Hash(TLIBSZHASH **ppshHosts)
     if (!ppshHosts || !*ppshHosts)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        const tavo::Fd list = OpenList();
+        const tavo::Fd list = tavo::OpenHostList(tavo::kHostListTaken);
         if (!list)
             return static_cast<int>(FailZero(ERR_OPEN_FAILED));
         const DeleteList always;

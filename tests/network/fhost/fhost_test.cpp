@@ -3,10 +3,14 @@
 
 #include "network/named_process.h"
 #include "network/net/cards.h"
+#include "support/appliance_root.h"
 
+#include <chrono>
+#include <csignal>
 #include <functional>
 
 #include <fcntl.h>
+#include <sys/file.h>
 #include <sys/socket.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -127,9 +131,25 @@ TEST_F(Discovery, TenCardsAreMoreThanAreAsked)
     EXPECT_EQ(sent.size(), 8u);
 }
 
-// A process that bears the daemon's name.
-struct Daemon : test::NamedProcess {
-    Daemon() : NamedProcess("/usr/tavo/bin/findhostd") {}
+// This process, as the daemon does it: with the lock of the pid file.
+class Daemon {
+  public:
+    Daemon() : fd_(::open(kPidFile, O_RDWR | O_CREAT | O_CLOEXEC, 0644))
+    {
+        EXPECT_EQ(::flock(fd_, LOCK_EX | LOCK_NB), 0);
+    }
+    ~Daemon()
+    {
+        ::close(fd_);
+        ::unlink(kPidFile);
+    }
+    Daemon(const Daemon &) = delete;
+    Daemon &operator=(const Daemon &) = delete;
+
+    static constexpr const char *kPidFile = "/var/run/findhostd.pid";
+
+  private:
+    int fd_;
 };
 
 TEST_F(Discovery, WithoutADaemonNothingIsCollected)
@@ -140,6 +160,81 @@ TEST_F(Discovery, WithoutADaemonNothingIsCollected)
     EXPECT_THAT(Sleeps(), ElementsAre("sleep 3"));
     EXPECT_THAT(log_.Texts().at(0), MatchesRegex("fhost_dump_host\\([0-9]+\\): findhostd daemon is not running ...."));
     EXPECT_THAT(sent, IsEmpty());
+}
+
+// Neither a name nor a pid file makes a daemon, and neither does a lock that somebody else has on the file.
+TEST_F(Discovery, OnlyTheLockOfThePidFileIsADaemon)
+{
+    WriteFile("/usr/tavo/bin/findhostd", "#!/bin/sh\nexit 1\n", 0755);
+    const test::NamedProcess pretender("/usr/tavo/bin/findhostd");
+    EXPECT_EQ(TAVOFHOSTDumpHost(), -1);
+    const Daemon daemon;
+    log_.Clear();
+    EXPECT_EQ(TAVOFHOSTDumpHost(), 0);
+    EXPECT_THAT(log_.Texts(), IsEmpty());
+    if (test::RootLacks("uids"))
+        return;
+    std::filesystem::remove(Daemon::kPidFile);
+    WriteFile(Daemon::kPidFile, std::to_string(::getpid()) + "\n");
+    int ready[2];
+    ASSERT_EQ(::pipe2(ready, O_CLOEXEC), 0);
+    const pid_t nobody = ::fork();
+    if (nobody == 0) {
+        const int fd = ::setresuid(65534, 65534, 65534) == 0 ? ::open(Daemon::kPidFile, O_RDONLY) : -1;
+        if (fd >= 0 && ::flock(fd, LOCK_EX) == 0)
+            (void)!::write(ready[1], "", 1);
+        ::pause();
+        ::_exit(0);
+    }
+    char byte;
+    EXPECT_EQ(::read(ready[0], &byte, 1), 1);
+    EXPECT_EQ(TAVOFHOSTDumpHost(), 0) << "it is started, and its pid is there";
+    EXPECT_THAT(log_.Texts().at(0), EndsWith("findhostd daemon is not running ...."));
+    ::kill(nobody, SIGKILL);
+    ::waitpid(nobody, nullptr, 0);
+}
+
+struct Heard {
+    std::vector<std::string> hosts;
+    size_t most = 100;
+
+    static int Note(const TAVOFHOST *host, void *context)
+    {
+        auto &heard = *static_cast<Heard *>(context);
+        heard.hosts.push_back(std::to_string(host->nModel) + " " + std::to_string(host->nProtocol) + " " +
+                              host->szName + " " + host->szIp + " " + host->szInterface);
+        return heard.hosts.size() == heard.most;
+    }
+};
+
+TEST_F(Discovery, HostsAreHandedToACallbackAndTheListStays)
+{
+    const Daemon daemon;
+    AddCard("eth0", "192.0.2.10");
+    const std::string list = "6,240,nas,192.0.2.11,eth0\n7,250,attic,192.0.2.12,eth1\n0,240,none,192.0.2.13,eth0\n";
+    WriteFile(kList, list);
+    WriteFile(kTaken, "6,240,nas,192.0.2.11,eth0\n8,240,taken,192.0.2.14,eth0\n");
+    Heard heard;
+    EXPECT_EQ(TAVOFHOSTEnum(Heard::Note, &heard, 3), 3);
+    EXPECT_THAT(heard.hosts,
+                ElementsAre("6 240 nas 192.0.2.11 eth0", "7 250 attic 192.0.2.12 eth1", "8 240 taken 192.0.2.14 eth0"));
+    EXPECT_THAT(Sleeps(), ElementsAre("sleep 1", "sleep 1", "sleep 1"));
+    EXPECT_EQ(sent.size(), 2u);
+    EXPECT_EQ(ReadFile(kList), list);
+
+    // What an earlier search left is no answer.
+    const auto past = std::filesystem::file_time_type::clock::now() - std::chrono::minutes(1);
+    std::filesystem::last_write_time(kTaken, past);
+    heard = {{}, 1};
+    EXPECT_EQ(TAVOFHOSTEnum(Heard::Note, &heard, 3), 1) << "the callback has heard enough";
+    EXPECT_EQ(heard.hosts.size(), 1u);
+
+    no_send_from = "192.0.2.10:0";
+    EXPECT_EQ(TAVOFHOSTEnum(Heard::Note, &heard, 3), -1);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "fhost_enum"}));
+    EXPECT_EQ(TAVOFHOSTEnum(nullptr, nullptr, 3), -1);
+    EXPECT_EQ(TAVOFHOSTEnum(Heard::Note, &heard, 0), -1);
+    EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
 }
 
 TEST_F(Discovery, TheListIsHandedOver)
@@ -160,7 +255,7 @@ TEST_F(Discovery, TheListIsHandedOver)
     EXPECT_EQ(ReadFile(kList), "") << "made for the daemon";
 }
 
-TEST_F(Discovery, WhatSomebodyLeftInTheListsPlaceGoes)
+TEST_F(Discovery, RemovesForeignFilesAtTheListPath)
 {
     const Daemon daemon;
     test::ScratchDir elsewhere;
@@ -170,6 +265,10 @@ TEST_F(Discovery, WhatSomebodyLeftInTheListsPlaceGoes)
         [&] { std::filesystem::create_symlink(victim, kList); },
         [&] { std::filesystem::create_hard_link(victim, kList); },
         [&] { EXPECT_EQ(::mkfifo(kList, 0666), 0); },
+        [&] {
+            std::filesystem::create_directory(kList);
+            WriteFile(std::string(kList) + "/file", "");
+        },
     };
     for (size_t i = 0; i < plants.size(); ++i) {
         std::filesystem::remove(kTaken);

@@ -1,4 +1,5 @@
 // The discovery packets byte for byte, and the table that bounds what a network can fill.
+#include "answer_budget.h"
 #include "host_table.h"
 #include "packet.h"
 
@@ -6,7 +7,9 @@
 
 #include <gmock/gmock.h>
 
+#include <cstdlib>
 #include <cstring>
+#include <map>
 
 #include <arpa/inet.h>
 
@@ -110,6 +113,28 @@ TEST(Packet, WhatIsNotWholeOrNotSoundIsNothing)
                                           "a\0b",
                                           5))},
         {"an escape", with(kName, std::string("\x12\x03\x1B[m", 5))},
+        {"a control of the second set", with(kName, "\x12\x03"
+                                                    "a\xC2\x9B")},
+        {"a mark of direction", with(kName, "\x12\x04"
+                                            "a\xE2\x80\xAE")},
+        {"an isolate", with(kName, "\x12\x04"
+                                   "a\xE2\x81\xA6")},
+        {"the Arabic mark", with(kName, "\x12\x03"
+                                        "a\xD8\x9C")},
+        {"a line separator", with(kName, "\x12\x04"
+                                         "a\xE2\x80\xA8")},
+        {"Latin 1", with(kName, "\x12\x02"
+                                "a\xE4")},
+        {"half a character", with(kName, "\x12\x03"
+                                         "a\xE2\x80")},
+        {"an overlong slash", with(kName, "\x12\x03"
+                                          "a\xC0\xAF")},
+        {"a surrogate", with(kName, "\x12\x04"
+                                    "a\xED\xA0\x80")},
+        {"beyond Unicode", with(kName, "\x12\x05"
+                                       "a\xF4\x90\x80\x80")},
+        {"another's address", with(kName, "\x12\x0F"
+                                          "nas(192.0.2.10)")},
         {"a blank at the end", with(kName, std::string("\x12\x02"
                                                        "a ",
                                                        4))},
@@ -125,25 +150,124 @@ TEST(Packet, WhatIsNotWholeOrNotSoundIsNothing)
     for (size_t size = 0; size < whole.size(); ++size)
         EXPECT_EQ(Kind(whole.substr(0, size)), PacketKind::other) << size;
     EXPECT_EQ(Kind(with(kName, "\x12\x3F" + std::string(63, 'a'))), PacketKind::reply);
-    EXPECT_EQ(Kind(with(kName, std::string("\x12\x02\xC3\xA4", 4))), PacketKind::reply) << "UTF-8";
+    for (const char *name : {"\x12\x02\xC3\xA4", "\x12\x03\xE2\x82\xAC", "\x12\x04\xF0\x9F\x98\x80"})
+        EXPECT_EQ(Kind(with(kName, name)), PacketKind::reply) << "UTF-8";
+}
+
+std::string Flooder(int i)
+{
+    return "10.0." + std::to_string(i / 250) + "." + std::to_string(i % 250 + 1);
+}
+
+TEST(HostTable, KeepsTheFirstAnswerOfACollection)
+{
+    HostTable table;
+    int64_t now = 1000000;
+    table.NoteQuery(now);
+    EXPECT_TRUE(table.Put(MakeHost("one", "192.0.2.1"), 0, now));
+    EXPECT_FALSE(table.Put(MakeHost("one", "192.0.2.1"), 0, now)) << "as it is there";
+    EXPECT_FALSE(table.Put(MakeHost("forged", "192.0.2.1"), 0, now + 1));
+    EXPECT_FALSE(table.Put(MakeHost("one", "192.0.2.1"), 3, now + 1)) << "over another interface";
+    table.NoteQuery(now += 5000);  // anybody may ask again
+    EXPECT_FALSE(table.Put(MakeHost("forged", "192.0.2.1"), 0, now));
+    EXPECT_EQ(table.Text(now), "16909060,240,one,192.0.2.1,\n");
+    table.NoteQuery(now += 5000);
+    EXPECT_TRUE(table.Put(MakeHost("renamed", "192.0.2.1"), 0, now));
+    EXPECT_EQ(table.Text(now), "16909060,240,renamed,192.0.2.1,\n");
+}
+
+TEST(HostTable, ForgetsByAge)
+{
+    HostTable table;
+    table.NoteQuery(1000);
+    EXPECT_TRUE(table.Put(MakeHost("one", "192.0.2.1"), 0, 1000));
+    EXPECT_TRUE(table.Put(MakeHost("two", "192.0.2.2"), 0, 1000));
+    EXPECT_FALSE(table.Put(MakeHost("two", "192.0.2.2"), 0, 9000));
+    EXPECT_THAT(table.Text(1000 + HostTable::kKept), testing::HasSubstr("one"));
+    EXPECT_EQ(table.Text(1001 + HostTable::kKept), "16909060,240,two,192.0.2.2,\n");
+    EXPECT_TRUE(table.Put(MakeHost("one", "192.0.2.1"), 0, 1001 + HostTable::kKept)) << "back again";
 }
 
 TEST(HostTable, HasRoomForSoMany)
 {
     HostTable table;
-    EXPECT_TRUE(table.Put(MakeHost("one", "192.0.2.1"), 0));
-    EXPECT_FALSE(table.Put(MakeHost("one", "192.0.2.1"), 0)) << "as it is there";
-    EXPECT_TRUE(table.Put(MakeHost("other", "192.0.2.1"), 0)) << "it has another name now";
-    EXPECT_EQ(table.Text(), "16909060,240,other,192.0.2.1,\n");
-    for (int i = 0; i < 1000; ++i)
-        table.Put(MakeHost("flood", ("10.0." + std::to_string(i / 250) + "." + std::to_string(i % 250 + 1)).c_str()),
-                  0);
+    table.NoteQuery(1000);
+    EXPECT_TRUE(table.Put(MakeHost("one", "192.0.2.1"), 0, 1000));
+    for (int i = 0; i < 3000; ++i)
+        table.Put(MakeHost("flood", Flooder(i).c_str()), 0, 1000);
     EXPECT_EQ(table.Size(), HostTable::kMost);
-    EXPECT_THAT(table.Text(), testing::StartsWith("16909060,240,other,192.0.2.1,\n")) << "who came first stays";
-    EXPECT_FALSE(table.Put(MakeHost("late", "192.0.2.99"), 0));
-    EXPECT_TRUE(table.Put(MakeHost("renamed", "192.0.2.1"), 0)) << "also in a full table";
-    table.Clear();
-    EXPECT_EQ(table.Text(), "");
+    EXPECT_THAT(table.Text(1000), testing::StartsWith("16909060,240,one,192.0.2.1,\n")) << "who came first stays";
+    EXPECT_FALSE(table.Put(MakeHost("late", "192.0.2.99"), 0, 1000));
+    EXPECT_TRUE(table.Put(MakeHost("late", "192.0.2.99"), 0, 1001 + HostTable::kKept));
+}
+
+in_addr At(const std::string &address)
+{
+    in_addr found;
+    found.s_addr = ::inet_addr(address.c_str());
+    return found;
+}
+
+// The most moments of the list that any second has.
+size_t MostInASecond(const std::vector<int64_t> &moments)
+{
+    size_t most = 0;
+    for (size_t first = 0, last = 0; last < moments.size(); ++last) {
+        while (moments[last] - moments[first] >= 1000)
+            ++first;
+        most = std::max(most, last - first + 1);
+    }
+    return most;
+}
+
+// A flood that asks thousands of times a second, from so many addresses, and a host that asks now and then.
+struct Flood {
+    findhostd::AnswerBudget budget;
+    std::vector<int64_t> all;
+    std::map<int, std::vector<int64_t>> each;
+
+    // How many of the host's queries are answered; one every `every` milliseconds.
+    int Run(int addresses, int64_t from, int64_t to, int64_t every)
+    {
+        int answered = 0;
+        for (int64_t now = from; now < to; ++now) {
+            for (int i = 0; i < 5; ++i) {
+                const int who = std::rand() % addresses;
+                if (budget.Take(At(Flooder(who)), now)) {
+                    all.push_back(now);
+                    each[who].push_back(now);
+                }
+            }
+            if ((now - from) % every == every / 2 && budget.Take(At("192.0.2.77"), now)) {
+                all.push_back(now);
+                ++answered;
+            }
+        }
+        return answered;
+    }
+};
+
+TEST(AnswerBudget, OneFlooderTakesNothingFromTheOthers)
+{
+    Flood flood;
+    EXPECT_EQ(flood.Run(1, 1, 20001, 1000), 20);
+    EXPECT_LE(MostInASecond(flood.all), 50u);
+    EXPECT_EQ(MostInASecond(flood.each[0]), 2u);
+}
+
+TEST(AnswerBudget, AWholeNetworkOfFloodersLeavesTheOthersTheirTurn)
+{
+    for (const unsigned seed : {1u, 2u, 3u, 4u, 5u}) {
+        std::srand(seed);
+        Flood flood;
+        EXPECT_GE(flood.Run(250, 1, 10001, 1000), 1) << "seed " << seed;
+        int64_t now = 10001;
+        for (int round = 0; round < 5; ++round, now += 12000)
+            EXPECT_GE(flood.Run(250, now, now + 12000, 1000), 1) << "seed " << seed << ", round " << round;
+        EXPECT_LE(MostInASecond(flood.all), 50u);
+        for (const auto &[who, moments] : flood.each)
+            EXPECT_LE(MostInASecond(moments), 2u);
+    }
 }
 
 }  // namespace
