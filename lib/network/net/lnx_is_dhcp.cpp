@@ -4,6 +4,8 @@
 #include "tavo_file.h"
 
 #include "core/detail/guard.h"
+#include "core/detail/lock_hold.h"
+#include "core/detail/log.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/interface_name.h"
 #include "network/detail/network_change.h"

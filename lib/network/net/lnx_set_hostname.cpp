@@ -4,6 +4,7 @@
 #include "tavo_file.h"
 
 #include "core/detail/guard.h"
+#include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/network_change.h"
@@ -14,7 +15,7 @@
 
 namespace {
 
-void PutBack(const std::string &stored, const char *refused)
+void PutBackName(const std::string &stored, const char *refused)
 {
     const tavo::KeepFault keep;
     if (stored.empty())
@@ -32,11 +33,11 @@ int SetName(const char *name)
         return Fail(TLIBErrGet());
     if (const int code = tavo::UpdateHosts(old_name)) {
         LogError("%s:%d Set %s error.", tavo::kHostsFile);
-        PutBack(stored, name);
+        PutBackName(stored, name);
         return Fail(code);
     }
     if (::sethostname(name, std::strlen(name)) != 0) {
-        PutBack(stored, name);
+        PutBackName(stored, name);
         return Fail(ERR_SYS_UNKNOWN);
     }
     return 0;

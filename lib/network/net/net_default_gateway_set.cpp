@@ -4,6 +4,7 @@
 #include "tavo_file.h"
 
 #include "core/detail/guard.h"
+#include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/ipv4_text.h"
@@ -18,7 +19,7 @@ int AddDefault(const std::string &gateway)
 }
 
 // What the kernel and the file had before; without a route the appliance would be cut off from whoever sets it.
-void PutBack(const std::string &live, const std::string &stored)
+void PutBackGateway(const std::string &live, const std::string &stored)
 {
     if (!stored.empty())
         TLIBFileSetKeyValue(tavo::kNetworkFile, "GATEWAY", stored.c_str(), nullptr);
@@ -50,7 +51,7 @@ int SetGateway(const std::string &gateway)
     }
     if (AddDefault(gateway) != 0) {
         LogError("%s(%d): failed to set default gateway.");
-        PutBack(live, stored);
+        PutBackGateway(live, stored);
         return Fail(ERR_OP_FAILURE);
     }
     return 0;

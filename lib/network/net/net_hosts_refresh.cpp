@@ -2,6 +2,7 @@
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"
+#include "core/detail/log.h"
 #include "network/detail/network_change.h"
 
 extern "C" int TAVONetHostsRefresh(void)
