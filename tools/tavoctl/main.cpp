@@ -1,7 +1,13 @@
 // tavoctl: what an administrator or a script runs to read and change the state of the appliance.
 #include "frame/program.h"
+#include "frame/terminal.h"
+
+#include <csignal>
 
 int main(int argc, char **argv)
 {
+    // A file that would become larger than the caller's limit is a failed write, with its message and nothing left.
+    std::signal(SIGXFSZ, SIG_IGN);
+    tavoctl::Terminal::UseUtf8();
     return tavoctl::Program().Run({argv + (argc > 0 ? 1 : 0), argv + argc});
 }

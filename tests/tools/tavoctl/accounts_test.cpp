@@ -84,7 +84,7 @@ json Shown(Words words)
     words.emplace_back("--json");
     const test::Ran ran = Tavoctl(words);
     EXPECT_TRUE(json::accept(ran.out)) << testing::PrintToString(words) << ran;
-    return json::accept(ran.out) ? json::parse(ran.out) : json();
+    return json::accept(ran.out) ? test::Facts(ran) : json();
 }
 
 class TavoctlAccounts : public testing::Test {
@@ -202,20 +202,20 @@ TEST_F(TavoctlAccounts, WhatIsRefusedChangesNothing)
 {
     const Refusal refusals[] = {
         {{"user", "add", "--empty-password", "Anna"}, 1, "ERR_USER_EXISTS"},
-        {{"user", "add", "--empty-password", "a:b"}, 1, "ERR_INVALID_USERNAME"},
-        {{"user", "add", "--empty-password", "..", "--uid", "3000"}, 1, "ERR_INVALID_USERNAME"},
+        {{"user", "add", "--empty-password", "a:b"}, 2, "ERR_INVALID_USERNAME"},
+        {{"user", "add", "--empty-password", "..", "--uid", "3000"}, 2, "ERR_INVALID_USERNAME"},
         {{"user", "add", "--empty-password", "eve", "--home", "/var/../etc"}, 2, "ERR_BAD_PARAMETERS"},
         {{"user", "add", "--empty-password", "eve", "--shell", "/bin/sh:"}, 2, "ERR_BAD_PARAMETERS"},
         {{"user", "add", "--empty-password", "eve", "--uid", "2000"}, 2, "berta"},
         {{"user", "modify", "anna", "--uid", "0"}, 2, "root"},
         {{"user", "rename", "anna", "BERTA"}, 1, "ERR_USER_EXISTS"},
-        {{"user", "rename", "anna", "an/na"}, 1, "ERR_INVALID_USERNAME"},
+        {{"user", "rename", "anna", "an/na"}, 2, "ERR_INVALID_USERNAME"},
         {{"user", "passwd", "nemo"}, 3, "ERR_NO_SUCH_USER"},
         {{"user", "show", "nemo"}, 3, "ERR_NO_SUCH_USER"},
         {{"user", "delete", "--yes", "anna", "nemo"}, 3, "ERR_NO_SUCH_USER"},
         {{"user", "delete", "--yes", "anna", "Admin", "--system"}, 1, "ERR_USER_DB_DELETE"},
         {{"user", "delete", "--yes", "anna", "guest"}, 2, "--system"},
-        {{"group", "add", "sixteen letters!"}, 1, "ERR_INVALID_GROUPNAME"},
+        {{"group", "add", "sixteen letters!"}, 2, "ERR_INVALID_GROUPNAME"},
         {{"group", "add", "Users"}, 1, "ERR_GROUP_EXISTS"},
         {{"group", "add", "staff", "--members", "anna,nemo"}, 3, "nemo"},
         {{"group", "add", "staff", "--description", "a:b"}, 2, "ERR_BAD_PARAMETERS"},
@@ -378,8 +378,8 @@ TEST_F(TavoctlAccounts, AListThatIsWrongAnywhereIsRefusedWhole)
         {{"user"}, "name,password_hash\nx,$1$ab$c\n", "some are missing"},
         {{"user"}, "[{\"name\":\"x\",\"password\":\"1\"},3]", "row 2 is no object"},
         {{"user"}, "[{\"name\":\"x\",\"password\":{}}]", "fits no field"},
-        {{"user"}, "{\"name\":\"x\"}", "no JSON array"},
-        {{"user"}, "[{\"name\":\"x\",\"password\":\"1\"}", "no JSON array"},
+        {{"user"}, "{\"name\":\"x\"}", "neither a JSON array"},
+        {{"user"}, "[{\"name\":\"x\",\"password\":\"1\"}", "neither a JSON array"},
         {{"group"}, "name,members\nnew,anna\nodd,\"anna,nemo\"\n", "nemo"},
         {{"group"}, "name,gid\nnew,70000\nodd,70000\n", "twice"},
     };
@@ -440,7 +440,7 @@ TEST_F(TavoctlAccounts, CheckNamesEveryDifferenceAndRepairsNone)
         const test::Ran ran = Tavoctl({family, "check", "--json"});
         EXPECT_EQ(ran.status, 1) << command << ran;
         bool found = false;
-        for (const json &row : json::parse(ran.out))
+        for (const json &row : test::Facts(ran))
             found |= row.at("name") == (name ? json(name) : json()) && row.at("file") == file &&
                      row.at("finding").get<std::string>().ends_with(finding);
         EXPECT_TRUE(found) << command << ran;

@@ -74,6 +74,8 @@ TEST(TavoctlFrame, WrongCommandLinesAreUsageAndSayNothingOnStandardOutput)
         {"proc", "run", "--timeout", "0", "true"},
         {"proc", "signal", "/tmp/pid", "NONSENSE"},
         {"error", "explain"},
+        {"error", "list", "--output", "nonsense"},
+        {"error", "list", "--output", ""},
         {"user", "show"},
         {"user", "add", "eve", "--empty-password", "--unknown-password"},
         {"user", "add", "eve", "--empty-password", "--expires", "soon"},
@@ -136,7 +138,8 @@ TEST(TavoctlFrame, FailureNamesCodePlaceAttemptAndHintOnOneLine)
     const test::Ran text = Tavoctl({"conf", "get", "no_such_key"});
     EXPECT_EQ(text.status, 3);
     EXPECT_THAT(text.err, StartsWith("tavoctl: cannot get no_such_key from /etc/tavoinfo.conf: ERR_KEY_NOT_FOUND "
-                                     "(0x2000) at file_get_key_value:108; "));
+                                     "(0x2000); "));
+    EXPECT_THAT(Tavoctl({"conf", "get", "--verbose", "no_such_key"}).err, HasSubstr(" at file_get_key_value:108; "));
     EXPECT_EQ(Lines(text.err).size(), 1u);
 
     const test::Ran ran = Tavoctl({"conf", "get", "--json", "no_such_key"});
@@ -184,10 +187,10 @@ TEST(TavoctlFrame, ForeignMachineIsNotChanged)
 
     // Looking is allowed, and so is meaning it.
     EXPECT_EQ(Tavoctl({"conf", "set", "--dry-run", "key", "value"}).status, 0);
-    EXPECT_EQ(json::parse(Tavoctl({"version", "--json"}).out).at("appliance"), false);
+    EXPECT_EQ(test::Facts({"version", "--json"}).at("appliance"), false);
     EXPECT_EQ(ReadFile("/etc/tavoinfo.conf"), before);
     EXPECT_EQ(Tavoctl({"conf", "set", "--force-host", "key", "value"}).status, 0);
-    EXPECT_EQ(ReadFile("/etc/tavoinfo.conf"), before + "key=value\n");
+    EXPECT_EQ(ReadFile("/etc/tavoinfo.conf"), before + "key=\"value\"\n");
 
     std::filesystem::copy_file(aside, "/etc.defaults/tavoinfo.conf");
     WriteFile("/etc/tavoinfo.conf", before);
@@ -204,8 +207,8 @@ TEST(TavoctlFrame, ColumnsAlignByCharacters)
                                                                   "e\n"
                                                                   "   4  long_key_name  \n");
     WriteFile(dir / "f", "# nothing\n");
-    EXPECT_EQ(Tavoctl({"conf", "list", "--file", dir / "f"}).out, "");
-    EXPECT_EQ(json::parse(Tavoctl({"conf", "list", "--json", "--file", dir / "f"}).out), json::array());
+    EXPECT_EQ(Tavoctl({"conf", "list", "--file", dir / "f"}).out, "LINE  KEY  VALUE\n");
+    EXPECT_EQ(test::Facts({"conf", "list", "--json", "--file", dir / "f"}), json::array());
 }
 
 TEST(TavoctlFrame, ControlCharactersNeverReachATerminal)
@@ -270,9 +273,54 @@ TEST(TavoctlFrame, AnAnswerThatCannotBeWrittenIsAFailure)
     EXPECT_EQ(test::ShellStatus(status), 1);
 }
 
+TEST(TavoctlFrame, TablesShowTheChosenColumnsInTheWidthOfTheTerminal)
+{
+    const ScratchDir dir;
+    const std::string file = dir / "f";
+    WriteFile(file, "k=v\nlong_key=" + std::string(100, 'x') + "\n");
+    EXPECT_EQ(Tavoctl({"conf", "list", "--output", "value,KEY", "--noheadings", "--file", file}).out,
+              "v" + std::string(99, ' ') + "  k\n" + std::string(100, 'x') + "  long_key\n");
+    // Characters of East Asian scripts take two columns, also where the environment names no such locale.
+    WriteFile(file, "k=\xE6\x97\xA5\xE6\x9C\xAC\nl=ab\n");
+    EXPECT_EQ(Tavoctl({"conf", "list", "--output", "value,key", "--noheadings", "--file", file}).out,
+              "\xE6\x97\xA5\xE6\x9C\xAC  k\nab    l\n");
+    if (test::RootLacks("pts"))
+        return;
+    WriteFile(file, "k=v\nlong_key=" + std::string(100, 'x') + "\n");
+    for (const Words &words :
+         {Words{"conf", "list", "--file", file}, {"error", "list"}, {"--help"}, {"net", "--help"}}) {
+        for (const std::string &line : Lines(TavoctlAtTerminal(words).out))
+            EXPECT_LE(line.size(), 81u) << line;  // with the carriage return
+    }
+    // Colours are for terminals only.
+    EXPECT_THAT(Tavoctl({"error", "list"}).out, Not(HasSubstr("\x1b")));
+}
+
+TEST(TavoctlFrame, MistypedWordsAreSuggested)
+{
+    const struct {
+        Words words;
+        int status;
+        const char *suggestion;
+    } cases[] = {
+        {{"cnof", "get"}, 2, "did you mean conf?"},
+        {{"conf", "gte"}, 2, "did you mean get?"},
+        {{"conf", "get", "--defautls", "x"}, 2, "did you mean --defaults?"},
+        {{"conf", "get", "runsmaba"}, 3, "did you mean runsamba?"},
+        {{"lock", "run", "tavoinof", "--", "true"}, 2, "did you mean tavoinfo?"},
+        {{"error", "explain", "ERR_KEY_NOT_FUOND"}, 3, "did you mean ERR_KEY_NOT_FOUND?"},
+        {{"error", "list", "--output", "nam"}, 2, "did you mean name?"},
+    };
+    for (const auto &[words, status, suggestion] : cases) {
+        const test::Ran ran = Tavoctl(words);
+        EXPECT_EQ(ran.status, status) << testing::PrintToString(words) << ran;
+        EXPECT_THAT(ran.err, HasSubstr(suggestion)) << testing::PrintToString(words);
+    }
+}
+
 TEST(TavoctlFrame, ErrorCodesAreTheLibrarysOwn)
 {
-    const json list = json::parse(Tavoctl({"error", "list", "--json"}).out);
+    const json list = test::Facts({"error", "list", "--json"});
     std::vector<bool> listed(static_cast<std::size_t>(errNum));
     for (const json &row : list) {
         const int code = std::stoi(row.at("code").get<std::string>(), nullptr, 16);
@@ -289,17 +337,17 @@ TEST(TavoctlFrame, ErrorCodesAreTheLibrarysOwn)
     for (std::size_t i = 0; i < listed.size(); ++i)
         EXPECT_TRUE(listed[i] || !*rgszErrMsg[i]) << rgszErrMsg[i];
 
-    const json explained = json::parse(Tavoctl({"error", "explain", "--json", "0x0400"}).out);
+    const json explained = test::Facts({"error", "explain", "--json", "0x0400"});
     EXPECT_EQ(explained.at("name"), "ERR_LOCK_FAILED");
     for (const char *form : {"1024", "0X400", "ERR_LOCK_FAILED", "err_lock_failed", "Lock_Failed"})
-        EXPECT_EQ(json::parse(Tavoctl({"error", "explain", "--json", form}).out), explained) << form;
+        EXPECT_EQ(test::Facts({"error", "explain", "--json", form}), explained) << form;
     for (const char *form : {"0x0401", "-1024", "0x", "1024 ", "ERR_", "99999999999"})
         EXPECT_EQ(Tavoctl({"error", "explain", "--", form}).status, 3) << form;
 }
 
 TEST(TavoctlFrame, VersionNamesMachineAndLibrary)
 {
-    const json version = json::parse(Tavoctl({"version", "--json"}).out);
+    const json version = test::Facts({"version", "--json"});
     EXPECT_EQ(version.at("machine").get<std::string>() + "\n", [] {
         std::ifstream in("/proc/sys/kernel/arch");
         std::ostringstream arch;

@@ -30,7 +30,7 @@ json Facts(Words words)
     words.insert(words.begin() + 2, "--json");
     const Ran ran = Tavoctl(words);
     EXPECT_EQ(ran.status, 0) << testing::PrintToString(words) << ran;
-    return json::parse(ran.out, nullptr, false);
+    return test::Facts(ran);
 }
 
 void Succeeds(const Words &words)

@@ -129,7 +129,7 @@ TEST(TavoctlPrograms, ARequestToEndGoesToTheProgramAndTheLockStaysUntilItHasEnde
 
 TEST(TavoctlPrograms, LockListIsTheTable)
 {
-    const json locks = json::parse(Tavoctl({"lock", "list", "--json"}).out);
+    const json locks = test::Facts({"lock", "list", "--json"});
     std::size_t i = 0;
     for (const TLIBLOCKFILE *lock = rgslckList; lock->fLockBit; ++lock, ++i) {
         ASSERT_LT(i, locks.size());
@@ -187,7 +187,7 @@ TEST(TavoctlPrograms, ProcFindsAndSignals)
     for (int i = 0; i < 200 && found.empty(); ++i) {
         const test::Ran ran = Tavoctl({"proc", "find", "--json", "sleep 98.7654"});
         if (ran.status == 0)
-            found = json::parse(ran.out);
+            found = test::Facts(ran);
     }
     EXPECT_EQ(found, (json{{{"pid", pid}, {"command", "sleep 98.7654"}}}));
     EXPECT_EQ(Tavoctl({"proc", "find", "no-such-process-anywhere"}).status, 3);

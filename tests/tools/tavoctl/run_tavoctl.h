@@ -6,6 +6,7 @@
 #include "support/running_program.h"
 
 #include <gtest/gtest.h>
+#include <nlohmann/json.hpp>
 
 #include <csignal>
 #include <cstdlib>
@@ -29,6 +30,17 @@ struct RunningTavoctl : RunningProgram {
 inline Ran Tavoctl(const Words &words, const std::string &input = {})
 {
     return RunningTavoctl(words, input).Wait();
+}
+
+// Runs what starts programs as the user "nobody", in a process of this test's own ids.
+template <class Start>
+Ran AsNobody(const Start &start)
+{
+    constexpr uid_t nobody = 65534;
+    EXPECT_EQ(::setegid(nobody) + ::seteuid(nobody), 0);
+    const Ran ran = start();
+    EXPECT_EQ(::seteuid(0) + ::setegid(0), 0);
+    return ran;
 }
 
 struct Answer {
@@ -81,6 +93,19 @@ inline Ran TavoctlAtTerminal(const Words &words, const std::vector<Answer> &answ
 inline Ran TavoctlAtTerminal(const Words &words, const std::string &typed = {})
 {
     return TavoctlAtTerminal(words, {{"", typed}});
+}
+
+// What a document says without its format_version: the items of a list, or the fields of one thing.
+inline nlohmann::json Facts(const Ran &ran)
+{
+    nlohmann::json document = nlohmann::json::parse(ran.out, nullptr, false);
+    EXPECT_TRUE(document.is_object() && document.erase("format_version") == 1) << ran;
+    return document.is_object() && document.contains("items") ? nlohmann::json(document.at("items")) : document;
+}
+
+inline nlohmann::json Facts(const Words &words)
+{
+    return Facts(Tavoctl(words));
 }
 
 }  // namespace test

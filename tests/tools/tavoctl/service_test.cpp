@@ -41,7 +41,7 @@ json Row(const std::string &service, const Words &options = {})
 {
     Words words = {"service", "list", "--json"};
     words.insert(words.end(), options.begin(), options.end());
-    for (const json &row : json::parse(Tavoctl(words).out)) {
+    for (const json &row : test::Facts(words)) {
         if (row.at("name") == service)
             return row;
     }
@@ -110,7 +110,7 @@ TEST_F(TavoctlService, WhatTheModelLacksIsListedOnlyWithAll)
     ASSERT_EQ(Tavoctl({"conf", "set", "--defaults", "supportsurveillance", "no"}).status, 0);
     EXPECT_EQ(Row("surveillance"), nullptr);
     EXPECT_EQ(Row("surveillance", {"--all"}).at("name"), "surveillance");
-    EXPECT_EQ(json::parse(Tavoctl({"service", "list", "--all", "--json"}).out).size(), 30u);
+    EXPECT_EQ(test::Facts({"service", "list", "--all", "--json"}).size(), 30u);
     ASSERT_EQ(Tavoctl({"conf", "set", "--defaults", "supportsurveillance", "yes"}).status, 0);
 }
 
@@ -127,9 +127,9 @@ TEST_F(TavoctlService, StatusGivesThreeWhenItIsNotRunning)
     ASSERT_EQ(::umount2("/volume2", MNT_DETACH), 0);
     const test::Ran adrift = Tavoctl({"service", "status", "--json", "web"});
     EXPECT_EQ(adrift.status, 0);
-    EXPECT_EQ(json::parse(adrift.out).at("on"), false);
-    EXPECT_EQ(json::parse(adrift.out).at("bound"), false);
-    EXPECT_EQ(json::parse(adrift.out).at("volumes"), json{"/volume2"});
+    EXPECT_EQ(test::Facts(adrift).at("on"), false);
+    EXPECT_EQ(test::Facts(adrift).at("bound"), false);
+    EXPECT_EQ(test::Facts(adrift).at("volumes"), json{"/volume2"});
 
     const test::Ran unknown = Tavoctl({"service", "status", "nothing"});
     EXPECT_EQ(unknown.status, 3);
@@ -141,9 +141,9 @@ TEST_F(TavoctlService, DryRunShowsFoldersAndBindsNothing)
     ASSERT_EQ(::mkdir("/volume2/video", 0755), 0);
     const test::Ran ran = Tavoctl({"service", "enable", "--dry-run", "--json", "media"});
     EXPECT_EQ(ran.status, 0);
-    EXPECT_EQ(json::parse(ran.out), (json{{{"service", "media"}, {"folder", "/volume2/music"}, {"there", false}},
-                                          {{"service", "media"}, {"folder", "/volume2/video"}, {"there", true}},
-                                          {{"service", "media"}, {"folder", "/volume2/photo"}, {"there", false}}}));
+    EXPECT_EQ(test::Facts(ran), (json{{{"service", "media"}, {"folder", "/volume2/music"}, {"there", false}},
+                                      {{"service", "media"}, {"folder", "/volume2/video"}, {"there", true}},
+                                      {{"service", "media"}, {"folder", "/volume2/photo"}, {"there", false}}}));
     EXPECT_FALSE(std::filesystem::exists("/volume2/music"));
     EXPECT_EQ(LinkTarget("/var/services/video"), "");
     EXPECT_EQ(Row("media").at("enabled"), false);
@@ -198,7 +198,7 @@ TEST_F(TavoctlService, ReloadSignalsOrSaysWhyNot)
 TEST_F(TavoctlService, VolumeBindsTheFoldersAndRestoreFindsThemAgain)
 {
     ASSERT_EQ(Tavoctl({"service", "enable", "--wait", "30", "web"}).status, 0);
-    EXPECT_EQ(json::parse(Tavoctl({"service", "volume", "--dry-run", "--json", "web", "1"}).out),
+    EXPECT_EQ(test::Facts({"service", "volume", "--dry-run", "--json", "web", "1"}),
               (json{{{"link", "/var/services/web"}, {"from", "/volume2/web"}, {"to", "/volume1/web"}}}));
     EXPECT_EQ(LinkTarget("/var/services/web"), "/volume2/web");
     EXPECT_EQ(Tavoctl({"service", "volume", "web", "1"}).status, 0);

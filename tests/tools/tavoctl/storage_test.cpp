@@ -110,7 +110,7 @@ TEST(TavoctlStorage, VolumesAreListedAndChanged)
 
     scenario.Expect(list).Prints(pvs);
     scenario.Expect(volumes).Prints(has_volume).Times(2);
-    const json rows = json::parse(Tavoctl({"lvm", "list", "--json"}).out);
+    const json rows = test::Facts({"lvm", "list", "--json"});
     ASSERT_EQ(rows.size(), 3u);
     EXPECT_EQ(rows[0].at("device"), "md2");
     EXPECT_EQ(rows[0].at("group"), "vg1");
@@ -150,7 +150,7 @@ TEST(TavoctlStorage, SuperblocksAreATable)
     scenario.Expect({"/sbin/mdadm", "-E", "/dev/sdb3"});
     const Ran ran = Tavoctl({"raid", "superblock", "--json", "sda3", "/dev/sdb3"});
     ASSERT_EQ(ran.status, 0) << ran;
-    const json rows = json::parse(ran.out);
+    const json rows = test::Facts(ran);
     ASSERT_EQ(rows.size(), 1u);
     EXPECT_EQ(rows[0].at("member"), "sda3");
     EXPECT_EQ(rows[0].at("level"), "raid5");
@@ -167,7 +167,7 @@ TEST(TavoctlStorage, WipingTellsHowFarItIs)
 {
     const std::string file = "/tmp/tavodd.sdz";
     WriteFile(file, "1610612736/4294967296\n");
-    const json facts = json::parse(Tavoctl({"disk", "wipe-status", "--json", "sdz"}).out);
+    const json facts = test::Facts({"disk", "wipe-status", "--json", "sdz"});
     EXPECT_EQ(facts.at("done"), 1610612736);
     EXPECT_EQ(facts.at("percent"), 37);
     EXPECT_THAT(Tavoctl({"disk", "wipe-status", "sdz"}).out,
@@ -182,7 +182,7 @@ TEST(TavoctlStorage, LayoutsAreAllThereHaveBeen)
     test::Scenario scenario;  // no disk is asked: there is none
     const Ran ran = Tavoctl({"partition", "layout", "--wake", "--json"});
     ASSERT_EQ(ran.status, 0) << ran;
-    const json rows = json::parse(ran.out);
+    const json rows = test::Facts(ran);
     ASSERT_EQ(rows.size(), 10u);
     EXPECT_EQ(rows[6].at("types"), json({"0xFD", "0xFD", "0xFD"}));
     for (const json &row : rows)

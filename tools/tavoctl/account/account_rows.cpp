@@ -6,14 +6,6 @@
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
-#include <cerrno>
-#include <cstring>
-#include <fstream>
-#include <iostream>
-#include <sstream>
-
-#include <fcntl.h>
-#include <unistd.h>
 
 namespace tavoctl {
 namespace {
@@ -103,9 +95,11 @@ std::string JsonText(const nlohmann::json &value, const AccountRow &row)
 
 std::vector<AccountRow> ParseJson(std::string_view text, const std::vector<std::string> &columns)
 {
-    const nlohmann::json list = nlohmann::json::parse(text, nullptr, false);
+    nlohmann::json list = nlohmann::json::parse(text, nullptr, false);
+    if (list.is_object() && list.contains("items"))  // as export writes it
+        list = nlohmann::json(list["items"]);
     if (!list.is_array())
-        Refuse("it is no JSON array");
+        Refuse("neither a JSON array nor an object with \"items\"");
     std::vector<AccountRow> rows;
     for (const nlohmann::json &object : list) {
         AccountRow row = {static_cast<int>(rows.size()) + 1, {}};
@@ -149,46 +143,6 @@ std::vector<AccountRow> ParseAccountRows(std::string_view text, const std::vecto
         if (const std::string *name = row.Find("name"); !name || name->empty())
             Refuse(row.Where() + " has no name");
     return rows;
-}
-
-std::string ReadWhole(const std::string &path)
-{
-    std::ostringstream text;
-    std::ifstream file;
-    errno = 0;
-    if (path != "-")
-        file.open(path, std::ios::binary);
-    std::istream &in = path == "-" ? std::cin : file;
-    if (in.peek() != std::istream::traits_type::eof())
-        text << in.rdbuf();
-    const bool opened = path == "-" || file.is_open();
-    if (!opened || in.bad() || errno == EISDIR)
-        throw Failure{.attempted = "read " + path,
-                      .reason = std::strerror(errno),
-                      .status = errno == ENOENT ? exit_not_found : exit_failed};
-    return text.str();
-}
-
-void WriteWhole(const std::string &path, const std::string &text)
-{
-    if (path.empty()) {
-        std::cout << text;
-        return;
-    }
-    const int fd = ::open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600);
-    std::size_t written = 0;
-    while (fd >= 0 && written < text.size()) {
-        const ssize_t count = ::write(fd, text.data() + written, text.size() - written);
-        if (count < 0 && errno != EINTR)
-            break;
-        written += count > 0 ? static_cast<std::size_t>(count) : 0;
-    }
-    const bool whole = fd >= 0 && written == text.size() && ::fsync(fd) == 0;
-    const int error = errno;
-    if (fd >= 0)
-        ::close(fd);
-    if (!whole)
-        throw Failure{.attempted = "write " + path, .reason = std::strerror(error)};
 }
 
 }  // namespace tavoctl

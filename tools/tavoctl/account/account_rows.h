@@ -20,12 +20,6 @@ struct AccountRow {
 // The text as rows of these columns, at least "name"; JSON is an array of objects. Throws a Failure for anything else.
 std::vector<AccountRow> ParseAccountRows(std::string_view text, const std::vector<std::string> &columns);
 
-// A whole file, or standard input for "-".
-std::string ReadWhole(const std::string &path);
-
-// To standard output, or into a new file that only its owner can read.
-void WriteWhole(const std::string &path, const std::string &text);
-
 }  // namespace tavoctl
 
 #endif

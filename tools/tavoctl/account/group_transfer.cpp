@@ -5,6 +5,7 @@
 #include "account/group_verbs.h"
 #include "account/user_record.h"
 #include "frame/failure.h"
+#include "frame/input_file.h"
 #include "frame/program.h"
 #include "frame/progress.h"
 #include "frame/table.h"

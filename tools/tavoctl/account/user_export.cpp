@@ -4,6 +4,7 @@
 #include "account/user_columns.h"
 #include "account/user_record.h"
 #include "account/user_verbs.h"
+#include "frame/input_file.h"
 #include "frame/program.h"
 
 #include <fstream>

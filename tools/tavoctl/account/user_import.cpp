@@ -6,6 +6,7 @@
 #include "account/user_record.h"
 #include "account/user_verbs.h"
 #include "frame/failure.h"
+#include "frame/input_file.h"
 #include "frame/password.h"
 #include "frame/program.h"
 

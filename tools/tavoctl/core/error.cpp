@@ -3,7 +3,7 @@
 #include "frame/error_codes.h"
 #include "frame/failure.h"
 #include "frame/program.h"
-#include "frame/table.h"
+#include "frame/suggestion.h"
 
 #include "tavo_error.h"
 
@@ -12,7 +12,20 @@
 namespace tavoctl {
 namespace {
 
-// A number as people write codes: 8192, 0x2000 or 2000h is not one of them.
+constexpr Column<ErrorCode> error_columns[] = {
+    {"code", [](const ErrorCode &row) { return Hexadecimal(row.code); }, "hexadecimal"},
+    {"name",
+     [](const ErrorCode &row) {
+         return std::string(row.name);
+     }},
+    {"meaning",
+     [](const ErrorCode &row) {
+         return std::string(row.meaning);
+     }},
+    {"hint", [](const ErrorCode &row) { return Maybe(row.hint); }, "what usually helps", in_details},
+};
+
+// A number as people write codes: 8192 or 0x2000, but not 2000h.
 const ErrorCode *Understood(const std::string &text)
 {
     const bool hexadecimal = text.starts_with("0x") || text.starts_with("0X");
@@ -30,63 +43,46 @@ std::vector<std::string> ErrorNames()
     return names;
 }
 
-class ErrorList : public Verb {
-  public:
-    static constexpr VerbInfo info = {"list", reads, "Lists the error codes with their meanings.",
-                                      "tavoctl error list\n"
-                                      "tavoctl error list --json"};
+constexpr ArgumentKind error_code = {.name = "code", .candidates = ErrorNames, .sample = "ERR_NO_SUCH_CODE"};
 
-    int Run(const Call &call) override
-    {
-        Table table({"code", "name", "meaning"});
-        for (const ErrorCode &row : ErrorCodes())
-            table.Add({Hexadecimal(row.code), row.name, row.meaning});
-        call.Print(table);
-        return exit_done;
-    }
-};
+Action ErrorList(Arguments &)
+{
+    return [](Call &call) {
+        call.List(error_columns, std::vector<ErrorCode>(ErrorCodes().begin(), ErrorCodes().end()));
+    };
+}
 
-class ErrorExplain : public Verb {
-  public:
-    static constexpr VerbInfo info = {"explain", reads, "Says what an error code means and what usually helps.",
-                                      "tavoctl error explain 0x2000\n"
-                                      "tavoctl error explain 8192\n"
-                                      "tavoctl error explain ERR_KEY_NOT_FOUND\n"
-                                      "tavoctl error explain key_not_found"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("CODE", code_, "a number, decimal or with 0x in front, or a name", ErrorNames);
-    }
-
-    int Run(const Call &call) override
-    {
-        const ErrorCode *row = Understood(code_);
+Action ErrorExplain(Arguments &in)
+{
+    const auto code = in.Text("CODE", error_code, "a number, decimal or with 0x in front, or a name");
+    return [=](Call &call) {
+        const ErrorCode *row = Understood(*code);
         if (!row)
-            throw Failure{.attempted = "explain " + code_,
+            throw Failure{.attempted = "explain " + *code,
                           .reason = "there is no such code",
-                          .hint = "tavoctl error list shows them",
+                          .hint = DidYouMean(*code, ErrorNames(), "tavoctl error list shows them"),
                           .status = exit_not_found};
-        Record record;
-        record.Add("code", Hexadecimal(row->code));
-        record.Add("name", row->name);
-        record.Add("meaning", row->meaning);
-        record.Add("hint", *row->hint ? Cell(row->hint) : Cell());
-        call.Print(record);
-        return exit_done;
-    }
-
-  private:
-    std::string code_;
-};
+        call.One(error_columns, *row);
+    };
+}
 
 }  // namespace
 
 void AddError(Program &program)
 {
     Family &error = program.Add("error", "The library's error codes");
-    error.Add<ErrorList>();
-    error.Add<ErrorExplain>();
+    error.Add("list", reads, Answer::List(error_columns), R"(Lists the error codes with their meanings.
+
+tavoctl error list
+tavoctl error list --json)",
+              ErrorList);
+    error.Add("explain", reads, Answer::One(error_columns), R"(Says what an error code means and what usually helps.
+
+tavoctl error explain 0x2000
+tavoctl error explain 8192
+tavoctl error explain ERR_KEY_NOT_FOUND
+tavoctl error explain key_not_found)",
+              ErrorExplain);
 }
 
 }  // namespace tavoctl

@@ -5,7 +5,7 @@
 #include "frame/held_locks.h"
 #include "frame/program.h"
 #include "frame/program_run.h"
-#include "frame/table.h"
+#include "frame/suggestion.h"
 
 #include "tavo_lock.h"
 
@@ -15,100 +15,97 @@
 namespace tavoctl {
 namespace {
 
+constexpr Column<TLIBLOCKFILE> lock_columns[] = {
+    {"lock",
+     [](const TLIBLOCKFILE &lock) {
+         return LockName(lock.szPath);
+     }},
+    {"mask", [](const TLIBLOCKFILE &lock) { return Hexadecimal(static_cast<int>(lock.fLockBit)); }, "hexadecimal"},
+    {"file",
+     [](const TLIBLOCKFILE &lock) {
+         return std::string(lock.szPath);
+     }},
+};
+
+std::vector<TLIBLOCKFILE> Locks()
+{
+    std::vector<TLIBLOCKFILE> locks;
+    for (const TLIBLOCKFILE *lock = rgslckList; lock->fLockBit; ++lock)
+        locks.push_back(*lock);
+    return locks;
+}
+
 std::vector<std::string> LockNames()
 {
     std::vector<std::string> names;
-    for (const TLIBLOCKFILE *lock = rgslckList; lock->fLockBit; ++lock)
-        names.push_back(LockName(lock->szPath));
+    for (const TLIBLOCKFILE &lock : Locks())
+        names.push_back(LockName(lock.szPath));
     return names;
 }
 
-unsigned KnownMask()
-{
-    unsigned mask = 0;
-    for (const TLIBLOCKFILE *lock = rgslckList; lock->fLockBit; ++lock)
-        mask |= lock->fLockBit;
-    return mask;
-}
+constexpr ArgumentKind lock_kind = {.name = "lock", .candidates = LockNames, .sample = "tavoinfo"};
 
 // One lock by its name, or any number of them by their bits.
 unsigned MaskOf(const std::string &word)
 {
-    for (const TLIBLOCKFILE *lock = rgslckList; lock->fLockBit; ++lock)
-        if (word == LockName(lock->szPath) || word == "lock_" + LockName(lock->szPath))
-            return lock->fLockBit;
-    const char *begin = word.c_str();
+    unsigned known = 0;
+    for (const TLIBLOCKFILE &lock : Locks()) {
+        if (word == LockName(lock.szPath) || word == "lock_" + LockName(lock.szPath))
+            return lock.fLockBit;
+        known |= lock.fLockBit;
+    }
     const bool hexadecimal = word.starts_with("0x") || word.starts_with("0X");
-    const char *end = begin + word.size();
+    const char *end = word.data() + word.size();
     unsigned mask = 0;
-    const auto [stop, error] = std::from_chars(begin + (hexadecimal ? 2 : 0), end, mask, hexadecimal ? 16 : 10);
+    const auto [stop, error] = std::from_chars(word.data() + (hexadecimal ? 2 : 0), end, mask, hexadecimal ? 16 : 10);
     if (error != std::errc{} || stop != end)
-        throw UsageFailure("take the lock " + word, "there is no such lock", "tavoctl lock list shows them");
-    if (!mask || (mask & ~KnownMask()))
+        throw UsageFailure("take the lock " + word, "there is no such lock",
+                           DidYouMean(word, LockNames(), "tavoctl lock list shows them"));
+    if (!mask || (mask & ~known))
         throw UsageFailure("take the locks " + word, "the mask has other bits than locks",
-                           "tavoctl lock list shows them; how to take them is said by --shared");
+                           "tavoctl lock list shows them; --shared says how to take them");
     return mask;
 }
 
-class LockList : public Verb {
-  public:
-    static constexpr VerbInfo info = {"list", reads, "Lists the locks in the order in which they are taken.",
-                                      "tavoctl lock list"};
-
-    int Run(const Call &call) override
-    {
-        Table table({"lock", "mask", "file"});
-        for (const TLIBLOCKFILE *lock = rgslckList; lock->fLockBit; ++lock)
-            table.Add({LockName(lock->szPath), Hexadecimal(static_cast<int>(lock->fLockBit)), lock->szPath});
-        call.Print(table);
-        return exit_done;
-    }
-};
-
-class LockRun : public Verb {
-  public:
-    static constexpr VerbInfo info = {"run", changes,
-                                      "Takes locks, all or none, runs PROGRAM and releases them when it has ended. The "
-                                      "exit status is the program's. Inside, `tavoctl conf set` would wait for a lock "
-                                      "that is held here.",
-                                      "tavoctl lock run tavoinfo -- vi /etc/tavoinfo.conf\n"
-                                      "tavoctl lock run --shared pw,gr -- tar cf accounts.tar /etc/passwd /etc/group\n"
-                                      "tavoctl lock run --timeout 0 0x840 -- true"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("LOCKS", locks_, "names, joined by commas, or the sum of their bits, such as 0x30", LockNames);
-        arguments.Flag("--shared", shared_, "with others who share");
-        arguments.Number("--timeout", "SECONDS", wait_, "how long to wait for them; 0: not at all (5)");
-        arguments.Program(program_);
-    }
-
-    int Run(const Call &) override
-    {
+Action LockRun(Arguments &in)
+{
+    const auto locks = in.Text("LOCKS", lock_kind, "names, joined by commas, or the sum of their bits, such as 0x30");
+    const auto shared = in.Flag("--shared", "with others who share");
+    const auto timeout = in.Number("--timeout", "SECONDS", "how long to wait for them; 0: not at all (5)");
+    const auto program = in.Program();
+    return [=](Call &call) {
         unsigned mask = 0;
-        std::istringstream words(locks_);
+        std::istringstream words(*locks);
         for (std::string word; std::getline(words, word, ',');)
             mask |= MaskOf(word);
         if (!mask)
             throw UsageFailure("take a lock", "none was named", "tavoctl lock list shows them");
-        const HeldLocks locks(mask, shared_, wait_);
-        return RunInForeground(program_);
-    }
-
-  private:
-    std::string locks_;
-    bool shared_ = false;
-    int wait_ = usual_wait;
-    std::vector<std::string> program_;
-};
+        const HeldLocks held(mask, *shared, timeout->value_or(usual_wait));
+        call.status = RunInForeground(*program);
+    };
+}
 
 }  // namespace
 
 void AddLock(Program &program)
 {
     Family &lock = program.Add("lock", "The locks by which programs take turns");
-    lock.Add<LockList>();
-    lock.Add<LockRun>();
+    lock.Add("list", reads, Answer::List(lock_columns), R"(Lists the locks in the order in which they are taken.
+
+tavoctl lock list)",
+             [](Arguments &) -> Action {
+                 return [](Call &call) {
+                     call.List(lock_columns, Locks());
+                 };
+             });
+    lock.Add("run", changes | by_anybody | runs_program, Answer::Nothing(), R"(Takes locks, all or none, runs PROGRAM
+and releases them when it has ended. The exit status is the program's. Inside, `tavoctl conf set` would wait for a lock
+that is held here.
+
+tavoctl lock run tavoinfo -- vi /etc/tavoinfo.conf
+tavoctl lock run --shared pw,gr -- tar cf accounts.tar /etc/passwd /etc/group
+tavoctl lock run --timeout 0 0x840 -- true)",
+             LockRun);
 }
 
 }  // namespace tavoctl

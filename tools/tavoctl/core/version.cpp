@@ -3,10 +3,10 @@
 #include "frame/failure.h"
 #include "frame/host.h"
 #include "frame/program.h"
-#include "frame/table.h"
 
 #include "tavo_error.h"
 
+#include <cerrno>
 #include <filesystem>
 
 #include <dlfcn.h>
@@ -14,6 +14,44 @@
 
 namespace tavoctl {
 namespace {
+
+struct Versions {
+    std::string library_file;
+    utsname machine;
+};
+
+std::string VersionIn(const std::string &file)
+{
+    const std::size_t mark = file.rfind(".so.");
+    return mark == std::string::npos ? "" : file.substr(mark + 4);
+}
+
+constexpr Column<Versions> version_columns[] = {
+    {"tavoctl",
+     [](const Versions &) {
+         return std::string(TAVOCTL_VERSION);
+     }},
+    {"library",
+     [](const Versions &v) {
+         return Maybe(VersionIn(v.library_file));
+     }},
+    {"library_file",
+     [](const Versions &v) {
+         return Maybe(v.library_file);
+     }},
+    {"machine",
+     [](const Versions &v) {
+         return std::string(v.machine.machine);
+     }},
+    {"kernel",
+     [](const Versions &v) {
+         return std::string(v.machine.release);
+     }},
+    {"appliance",
+     [](const Versions &) {
+         return IsAppliance();
+     }},
+};
 
 // The file that the library was loaded from, with the links followed: its name ends in the version.
 std::string LibraryFile()
@@ -26,43 +64,27 @@ std::string LibraryFile()
     return file.empty() ? found.dli_fname : file.string();
 }
 
-std::string VersionIn(const std::string &file)
+Action ShowVersion(Arguments &)
 {
-    const std::size_t mark = file.rfind(".so.");
-    return mark == std::string::npos ? "" : file.substr(mark + 4);
+    return [](Call &call) {
+        Versions versions = {LibraryFile(), {}};
+        if (::uname(&versions.machine) != 0)
+            throw SystemFailure("ask the kernel for the machine", errno);
+        call.One(version_columns, versions);
+    };
 }
-
-class Version : public Verb {
-  public:
-    static constexpr VerbInfo info = {"", reads,
-                                      "Shows the versions of this program and of the library that it runs on, and the "
-                                      "machine.",
-                                      "tavoctl version\n"
-                                      "tavoctl version --json"};
-
-    int Run(const Call &call) override
-    {
-        utsname machine = {};
-        if (::uname(&machine) != 0)
-            throw Failure{.attempted = "ask the kernel for the machine"};
-        const std::string library = LibraryFile();
-        Record record;
-        record.Add("tavoctl", TAVOCTL_VERSION);
-        record.Add("library", Known(VersionIn(library)));
-        record.Add("library_file", Known(library));
-        record.Add("machine", machine.machine);
-        record.Add("kernel", machine.release);
-        record.Add("appliance", IsAppliance());
-        call.Print(record);
-        return exit_done;
-    }
-};
 
 }  // namespace
 
 void AddVersion(Program &program)
 {
-    program.Add("version", "The versions of this program and of the library").Add<Version>();
+    program.Add("version", "The versions of this program and of the library")
+        .Add("", reads, Answer::One(version_columns), R"(Shows the versions of this program and of the library that it
+runs on, and the machine.
+
+tavoctl version
+tavoctl version --json)",
+             ShowVersion);
 }
 
 }  // namespace tavoctl

@@ -2,10 +2,13 @@
 #include "frame/arguments.h"
 
 #include "frame/failure.h"
+#include "frame/paragraph.h"
+#include "frame/suggestion.h"
 
 #include <CLI/CLI.hpp>
 
 #include <algorithm>
+#include <charconv>
 #include <utility>
 
 namespace tavoctl {
@@ -14,17 +17,86 @@ struct Arguments::Parts {
     std::string command;
     CLI::App app;
     std::vector<ArgumentText> texts;
-    std::vector<std::string> *program = nullptr;
+    std::vector<std::pair<bool, std::function<void()>>> readers;  // whether it is a flag's
+    std::function<void(Words)> program;
 
-    template <class Value>
-    CLI::Option *Add(ArgumentText text, Value &value)
+    // The reader is called with the words, and only when there are some.
+    CLI::Option *Add(ArgumentText text, std::function<void(const Words &)> reader)
     {
-        CLI::Option *option = app.add_option(text.name, value);
+        CLI::Option *option = text.value.empty() ? app.add_flag(text.name) : app.add_option(text.name);
         option->required(text.required);
+        const std::size_t index = texts.size();
+        const bool flag = text.value.empty();
         texts.push_back(std::move(text));
+        readers.emplace_back(flag, [this, index, option, reader = std::move(reader)] {
+            if (option->count() == 0)
+                return;
+            for (const std::string &word : option->results())
+                Check(texts[index], word);
+            reader(option->results());
+        });
         return option;
     }
+
+    static void Check(const ArgumentText &text, const std::string &word)
+    {
+        std::string allowed = text.kind.allowed;
+        for (const std::string &choice : text.choices)
+            allowed += (allowed.empty() ? "" : ", ") + choice;
+        const bool chosen = text.choices.empty() || std::count(text.choices.begin(), text.choices.end(), word) > 0;
+        if (chosen && (!text.kind.valid || text.kind.valid(word)))
+            return;
+        throw Failure{.attempted = "take " + word + " as " + text.name,
+                      .reason = "allowed: " + allowed,
+                      .hint = DidYouMean(word, text.choices, text.kind.code ? " " : ""),
+                      .code = text.kind.code,
+                      .status = exit_usage};
+    }
+
+    std::string UnknownOption(const Words &words) const
+    {
+        std::vector<std::string> names;
+        for (const ArgumentText &text : texts)
+            if (!text.positional)
+                names.push_back(text.name);
+        for (const std::string &word : words) {
+            if (word == "--")
+                break;
+            const std::string name = word.substr(0, word.find('='));
+            if (name.size() > 1 && name[0] == '-' && std::count(names.begin(), names.end(), name) == 0)
+                return DidYouMean(name, names, "");
+        }
+        return "";
+    }
 };
+
+namespace {
+
+ArgumentText TextOf(const std::string &name, const std::string &value, const std::string &help,
+                    const ArgumentKind &kind, bool required, bool many = false, Words choices = {})
+{
+    return {name, value, help, name[0] != '-', required, many, kind, std::move(choices)};
+}
+
+ArgumentKind KindWith(Candidates candidates)
+{
+    ArgumentKind kind = any_text;
+    kind.candidates = candidates;
+    return kind;
+}
+
+int64_t ParseNumber(const std::string &name, const std::string &word, int64_t least, int64_t most)
+{
+    int64_t number = 0;
+    const char *end = word.data() + word.size();
+    const auto [stop, error] = std::from_chars(word.data(), end, number);
+    if (error != std::errc() || stop != end || number < least || number > most)
+        throw UsageFailure("take " + word + " as " + name,
+                           "allowed: a number from " + std::to_string(least) + " to " + std::to_string(most));
+    return number;
+}
+
+}  // namespace
 
 Arguments::Arguments(std::string command) : parts_(std::make_unique<Parts>())
 {
@@ -34,78 +106,170 @@ Arguments::Arguments(std::string command) : parts_(std::make_unique<Parts>())
 
 Arguments::~Arguments() = default;
 
+Given<std::string> Arguments::Text(const char *name, const ArgumentKind &kind, std::string help)
+{
+    Given<std::string> given;
+    parts_->Add(TextOf(name, name, help, kind, true), [given](const Words &words) { given.Set(words[0]); });
+    return given;
+}
+
+Given<std::optional<std::string>> Arguments::OptionalText(const char *name, const ArgumentKind &kind, std::string help)
+{
+    return Option(name, name, kind, std::move(help));
+}
+
+Given<Words> Arguments::Texts(const char *name, const ArgumentKind &kind, std::string help, int at_least)
+{
+    Given<Words> given;
+    parts_->Add(TextOf(name, name, help, kind, at_least > 0, true), [given](const Words &words) { given.Set(words); })
+        ->expected(at_least, CLI::detail::expected_max_vector_size)
+        ->allow_extra_args();
+    return given;
+}
+
+Given<std::optional<std::string>> Arguments::Option(const char *name, const char *value_name, const ArgumentKind &kind,
+                                                    std::string help)
+{
+    Given<std::optional<std::string>> given;
+    parts_->Add(TextOf(name, value_name, help, kind, false), [given](const Words &words) { given.Set(words[0]); });
+    return given;
+}
+
+Given<std::string> Arguments::Choice(const char *name, Words choices, std::string help)
+{
+    Given<std::string> given;
+    parts_->Add(TextOf(name, name, help, any_text, true, false, std::move(choices)),
+                [given](const Words &words) { given.Set(words[0]); });
+    return given;
+}
+
+Given<std::optional<std::string>> Arguments::OptionalChoice(const char *name, const char *value_name, Words choices,
+                                                            std::string help)
+{
+    Given<std::optional<std::string>> given;
+    parts_->Add(TextOf(name, value_name, help, any_text, false, false, std::move(choices)),
+                [given](const Words &words) { given.Set(words[0]); });
+    return given;
+}
+
+Given<std::optional<int64_t>> Arguments::Number(const char *name, const char *value_name, std::string help,
+                                                int64_t least, int64_t most)
+{
+    Given<std::optional<int64_t>> given;
+    ArgumentKind kind = any_text;
+    kind.name = "number";
+    kind.sample = "7";
+    kind.wrong = "many";
+    parts_->Add(TextOf(name, value_name, help, kind, name[0] != '-'),
+                [=](const Words &words) { given.Set(ParseNumber(name, words[0], least, most)); });
+    return given;
+}
+
+Given<bool> Arguments::Flag(const char *name, std::string help)
+{
+    Given<bool> given;
+    parts_->Add(TextOf(name, "", help, any_text, false), [given](const Words &) { given.Set(true); });
+    return given;
+}
+
+Given<Words> Arguments::Program()
+{
+    Given<Words> given;
+    parts_->program = [given](Words words) {
+        given.Set(std::move(words));
+    };
+    parts_->app.prefix_command();
+    parts_->texts.push_back(TextOf("PROGRAM", "PROGRAM", "the program, then its arguments", any_text, true, true));
+    return given;
+}
+
 void Arguments::Text(const std::string &name, std::string &value, const std::string &help, Candidates candidates)
 {
-    parts_->Add({name, name, help, true, true, false, candidates}, value);
+    parts_->Add(TextOf(name, name, help, KindWith(candidates), true), [&](const Words &words) { value = words[0]; });
 }
 
 void Arguments::OptionalText(const std::string &name, std::string &value, const std::string &help,
                              Candidates candidates)
 {
-    parts_->Add({name, name, help, true, false, false, candidates}, value);
+    parts_->Add(TextOf(name, name, help, KindWith(candidates), false), [&](const Words &words) { value = words[0]; });
 }
 
-void Arguments::Texts(const std::string &name, std::vector<std::string> &values, const std::string &help, int at_least,
+void Arguments::Texts(const std::string &name, Words &values, const std::string &help, int at_least,
                       Candidates candidates)
 {
-    CLI::Option *option = parts_->Add({name, name, help, true, at_least > 0, true, candidates}, values);
-    option->expected(at_least, CLI::detail::expected_max_vector_size);
+    parts_
+        ->Add(TextOf(name, name, help, KindWith(candidates), at_least > 0, true),
+              [&](const Words &words) { values = words; })
+        ->expected(at_least, CLI::detail::expected_max_vector_size)
+        ->allow_extra_args();
 }
 
 void Arguments::Option(const std::string &name, const std::string &value_name, std::string &value,
                        const std::string &help, Candidates candidates)
 {
-    parts_->Add({name, value_name, help, false, false, false, candidates}, value);
+    parts_->Add(TextOf(name, value_name, help, KindWith(candidates), false),
+                [&](const Words &words) { value = words[0]; });
 }
 
 void Arguments::Option(const std::string &name, const std::string &value_name, std::optional<std::string> &value,
                        const std::string &help, Candidates candidates)
 {
-    parts_->Add({name, value_name, help, false, false, false, candidates}, value);
+    parts_->Add(TextOf(name, value_name, help, KindWith(candidates), false),
+                [&](const Words &words) { value = words[0]; });
 }
 
 void Arguments::Number(const std::string &name, const std::string &value_name, int &value, const std::string &help,
                        int least, int most)
 {
-    parts_->Add({name, value_name, help, name[0] != '-', name[0] != '-', false, nullptr}, value)
-        ->check(CLI::Range(least, most));
+    parts_->Add(TextOf(name, value_name, help, any_text, name[0] != '-'), [=, &value](const Words &words) {
+        value = static_cast<int>(ParseNumber(name, words[0], least, most));
+    });
 }
 
 void Arguments::Flag(const std::string &name, bool &value, const std::string &help)
 {
-    parts_->app.add_flag(name, value);
-    parts_->texts.push_back({name, "", help, false, false, false, nullptr});
+    parts_->Add(TextOf(name, "", help, any_text, false), [&](const Words &) { value = true; });
 }
 
-void Arguments::Program(std::vector<std::string> &words)
+void Arguments::Program(Words &words)
 {
-    parts_->program = &words;
+    parts_->program = [&](Words given) {
+        words = std::move(given);
+    };
     parts_->app.prefix_command();
-    parts_->texts.push_back({"PROGRAM", "PROGRAM", "the program, then its arguments", true, true, true, nullptr});
+    parts_->texts.push_back(TextOf("PROGRAM", "PROGRAM", "the program, then its arguments", any_text, true, true));
 }
 
-bool Arguments::Parse(std::vector<std::string> words)
+bool Arguments::Parse(Words words)
 {
     bool help = false;
     parts_->app.add_flag("-h,--help", help);
-    std::string wrong;
+    std::string wrong, hint;
     try {
-        std::reverse(words.begin(), words.end());
-        parts_->app.parse(std::move(words));
+        Words reversed(words.rbegin(), words.rend());
+        parts_->app.parse(std::move(reversed));
     } catch (const CLI::ParseError &error) {
         wrong = error.what();
+        hint = parts_->UnknownOption(words);
     }
     if (help)
         return false;
     if (wrong.empty() && parts_->program) {
-        *parts_->program = parts_->app.remaining();
-        if (!parts_->program->empty() && parts_->program->front() == "--")
-            parts_->program->erase(parts_->program->begin());
-        if (parts_->program->empty())
+        Words program = parts_->app.remaining();
+        if (!program.empty() && program.front() == "--")
+            program.erase(program.begin());
+        if (program.empty())
             wrong = "PROGRAM is required";
+        parts_->program(std::move(program));
     }
     if (!wrong.empty())
-        throw UsageFailure("understand the command line", wrong, "see " + parts_->command + " --help");
+        throw UsageFailure("understand the command line", wrong,
+                           hint.empty() ? "see " + parts_->command + " --help" : hint);
+    // Flags first: a failure of the others is reported as --json says.
+    for (const bool flags : {true, false})
+        for (std::size_t i = 0; i < parts_->readers.size(); ++i)
+            if (parts_->readers[i].first == flags)
+                parts_->readers[i].second();
     return true;
 }
 
@@ -130,20 +294,13 @@ std::string Arguments::Usage() const
 std::string Arguments::Help() const
 {
     std::vector<std::pair<std::string, std::string>> lines;
-    for (const bool positional : {true, false}) {
+    for (const bool positional : {true, false})
         for (const ArgumentText &text : parts_->texts)
             if (text.positional == positional)
                 lines.emplace_back(positional || text.value.empty() ? text.name : text.name + " " + text.value,
                                    text.help);
-    }
     lines.emplace_back("-h, --help", "this text");
-    std::size_t width = 0;
-    for (const auto &[name, help] : lines)
-        width = std::max(width, name.size());
-    std::string text;
-    for (const auto &[name, help] : lines)
-        text += "  " + name + std::string(width - name.size() + 2, ' ') + help + "\n";
-    return text;
+    return Described(lines);
 }
 
 }  // namespace tavoctl

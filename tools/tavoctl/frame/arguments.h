@@ -1,7 +1,12 @@
-// The arguments and options of one verb: declared once, used for parsing, the help text, the man page and completion.
+// The arguments and options of one verb: declared and read in one place, used for parsing, the help text, the man page and
+// completion.
 #ifndef TAVOCTL_ARGUMENTS_H
 #define TAVOCTL_ARGUMENTS_H
 
+#include "frame/argument_kind.h"
+
+#include <cstdint>
+#include <functional>
 #include <limits>
 #include <memory>
 #include <optional>
@@ -9,9 +14,6 @@
 #include <vector>
 
 namespace tavoctl {
-
-// Names that may stand at a place; for completion only.
-using Candidates = std::vector<std::string> (*)();
 
 // What the declarations say of one argument ("KEY") or option ("--file").
 struct ArgumentText {
@@ -21,11 +23,27 @@ struct ArgumentText {
     bool positional;
     bool required;
     bool many;
-    Candidates candidates;
+    ArgumentKind kind;
+    std::vector<std::string> choices;  // when nothing else is allowed
 };
 
-// A name that begins with "--" is an option, any other an argument by its place. The variables keep their values where
-// an option is not given, and must outlive Parse.
+// The value of an argument, once the command line was read.
+template <class Value>
+class Given {
+  public:
+    explicit Given(Value initial = {}) : value_(std::make_shared<Value>(std::move(initial))) {}
+    const Value &operator*() const { return *value_; }
+    const Value *operator->() const { return value_.get(); }
+    void Set(Value value) const { *value_ = std::move(value); }
+
+  private:
+    std::shared_ptr<Value> value_;
+};
+
+using Words = std::vector<std::string>;
+inline constexpr int64_t most_seconds = std::numeric_limits<int32_t>::max();
+
+// A name that begins with "--" is an option, any other an argument by its place.
 class Arguments {
   public:
     explicit Arguments(std::string command);  // "tavoctl conf set"
@@ -33,30 +51,44 @@ class Arguments {
     Arguments(const Arguments &) = delete;
     Arguments &operator=(const Arguments &) = delete;
 
+    Given<std::string> Text(const char *name, const ArgumentKind &kind, std::string help);
+    Given<std::optional<std::string>> OptionalText(const char *name, const ArgumentKind &kind, std::string help);
+    // From at_least values on; they are the last arguments by place.
+    Given<Words> Texts(const char *name, const ArgumentKind &kind, std::string help, int at_least = 1);
+    Given<std::optional<std::string>> Option(const char *name, const char *value_name, const ArgumentKind &kind,
+                                             std::string help);
+    // One of these words.
+    Given<std::string> Choice(const char *name, Words choices, std::string help);
+    Given<std::optional<std::string>> OptionalChoice(const char *name, const char *value_name, Words choices,
+                                                     std::string help);
+    // A required argument, or an option.
+    Given<std::optional<int64_t>> Number(const char *name, const char *value_name, std::string help, int64_t least = 0,
+                                         int64_t most = most_seconds);
+    Given<bool> Flag(const char *name, std::string help);
+    // A program with its own arguments: everything from the first word on that the declarations before do not take.
+    Given<Words> Program();
+
+    // Throws a Failure for a wrong command line. False: help was asked for and nothing is to be done.
+    bool Parse(Words words);
+
+    const std::vector<ArgumentText> &Texts() const;
+    std::string Usage() const;  // "tavoctl conf set [OPTION]... KEY VALUE"
+    std::string Help() const;   // the options and arguments, described
+
+    // For verbs that are classes.
     void Text(const std::string &name, std::string &value, const std::string &help, Candidates candidates = nullptr);
     void OptionalText(const std::string &name, std::string &value, const std::string &help,
                       Candidates candidates = nullptr);
-    // From at_least values on; they are the last arguments by place.
-    void Texts(const std::string &name, std::vector<std::string> &values, const std::string &help, int at_least = 1,
+    void Texts(const std::string &name, Words &values, const std::string &help, int at_least = 1,
                Candidates candidates = nullptr);
-    // An option that takes a value of this name.
     void Option(const std::string &name, const std::string &value_name, std::string &value, const std::string &help,
                 Candidates candidates = nullptr);
-    // Nothing when it is not given, which is not the same as an empty text.
     void Option(const std::string &name, const std::string &value_name, std::optional<std::string> &value,
                 const std::string &help, Candidates candidates = nullptr);
     void Number(const std::string &name, const std::string &value_name, int &value, const std::string &help,
                 int least = 0, int most = std::numeric_limits<int>::max());
     void Flag(const std::string &name, bool &value, const std::string &help);
-    // A program with its own arguments: everything from the first word on that is not taken by the declarations before.
-    void Program(std::vector<std::string> &words);
-
-    // Throws a Failure for a wrong command line. False: help was asked for and nothing is to be done.
-    bool Parse(std::vector<std::string> words);
-
-    const std::vector<ArgumentText> &Texts() const;
-    std::string Usage() const;  // "tavoctl conf set [OPTIONS] KEY VALUE"
-    std::string Help() const;   // the options and arguments, described
+    void Program(Words &words);
 
   private:
     struct Parts;

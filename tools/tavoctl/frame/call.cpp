@@ -1,44 +1,59 @@
 // How a verb answers and asks.
 #include "frame/failure.h"
 #include "frame/table.h"
+#include "frame/terminal.h"
 #include "frame/terminal_text.h"
 #include "frame/verb.h"
 
-#include <cstdio>
+#include <algorithm>
 #include <iostream>
 
 #include <unistd.h>
 
 namespace tavoctl {
-namespace {
-
-template <class Facts>
-void PrintFacts(const Facts &facts, bool json)
-{
-    if (json)
-        std::cout << facts.Json() << "\n";
-    else
-        std::cout << facts.Text();
-}
-
-}  // namespace
 
 void Call::Print(const Table &table) const
 {
-    PrintFacts(table, json);
+    if (json)
+        std::cout << table.Json() << "\n";
+    else
+        Terminal::Page(table.Text(style));
 }
 
 void Call::Print(const Record &record) const
 {
-    PrintFacts(record, json);
+    if (json)
+        std::cout << record.Json() << "\n";
+    else
+        Terminal::Page(record.Text());
 }
 
 void Call::PrintValue(const std::string &value, const Record &record) const
 {
     if (json)
-        PrintFacts(record, true);
+        Print(record);
     else
         std::cout << (::isatty(STDOUT_FILENO) ? Printable(value) : value) << "\n";
+}
+
+bool Call::IsWanted(const ColumnFacts &column) const
+{
+    return column.place != in_one || std::count(style.columns.begin(), style.columns.end(), column.name) > 0;
+}
+
+void Call::Change(const std::string &object, const std::string &column, const Cell &before, const Cell &after)
+{
+    if (!(before == after))
+        report.changes.push_back({object, column, before, after});
+}
+
+bool Call::Proceed(const std::string &question) const
+{
+    if (dry_run || !report.Changed())
+        return false;
+    if (!question.empty())
+        Confirm(question);
+    return true;
 }
 
 void Call::Confirm(const std::string &question) const

@@ -36,7 +36,9 @@ std::vector<std::string> OfVerb(const Arguments &declared, const std::vector<std
         const ArgumentText *last = places.back();
         pending = place < places.size() ? places[place] : last->many ? last : nullptr;
     }
-    return pending && pending->candidates ? pending->candidates() : std::vector<std::string>{};
+    if (!pending)
+        return {};
+    return pending->kind.candidates ? pending->kind.candidates() : pending->choices;
 }
 
 std::vector<std::string> AllOf(const Program &program, const std::vector<std::string> &words)
@@ -53,7 +55,7 @@ std::vector<std::string> AllOf(const Program &program, const std::vector<std::st
     const VerbEntry *only = family->Find("");
     if (!only && words.size() == 2) {
         for (const VerbEntry &entry : family->Verbs())
-            names.emplace_back(entry.info.name);
+            names.emplace_back(entry.name);
         return names;
     }
     const VerbEntry *entry = only ? only : family->Find(words[1]);

@@ -7,9 +7,10 @@ namespace tavoctl {
 enum ExitStatus : int {
     exit_done = 0,
     exit_failed = 1,
-    exit_usage = 2,      // a wrong command line, or an argument that the library refuses
-    exit_not_found = 3,  // what was asked for is not there
-    exit_busy = 4,       // somebody else holds a lock or a device
+    exit_usage = 2,      // the command line or an argument is wrong, whichever layer noticed
+    exit_not_found = 3,  // the object is not there
+    exit_busy = 4,       // somebody else holds a lock or a device: trying again may help
+    exit_denied = 5,     // permission denied: only root may do it
 };
 
 // What `lock run` gives for a program that it could not run, as shells do.

@@ -8,7 +8,13 @@
 
 #include <nlohmann/json.hpp>
 
+#include <cerrno>
+#include <cstring>
 #include <utility>
+#include <vector>
+
+#include <fcntl.h>
+#include <unistd.h>
 
 namespace tavoctl {
 namespace {
@@ -32,7 +38,16 @@ int StatusOf(int code)
         return exit_busy;
     case ERR_BAD_PARAMETERS:
     case ERR_USAGE:
+    case ERR_INVALID_SERVERNAME:
+    case ERR_INVALID_DOMAINNAME:
+    case ERR_INVALID_NETNAME:
+    case ERR_INVALID_SHARENAME:
+    case ERR_INVALID_GROUPNAME:
+    case ERR_INVALID_USERNAME:
+    case ERR_INVALID_PASSWORDNAME:
         return exit_usage;
+    case ERR_ACCESS_DENIED:
+        return exit_denied;
     default:
         return exit_failed;
     }
@@ -53,16 +68,16 @@ std::string Failure::Hint() const
     return error ? error->hint : "";
 }
 
-std::string Failure::Text() const
+std::string Failure::Text(bool verbose) const
 {
     std::string text = "tavoctl: cannot " + attempted + ": ";
     if (!reason.empty())
         text += reason + (code ? ", " : "");
     if (code)
         text += ErrorName(code) + " (" + Hexadecimal(code) + ")";
-    if (!module.empty())
+    if (verbose && !module.empty())
         text += " at " + module + ":" + std::to_string(line);
-    if (const std::string advice = Hint(); !advice.empty())
+    if (const std::string advice = Hint(); advice.find_first_not_of(' ') != std::string::npos)
         text += "; " + advice;
     return Printable(text);
 }
@@ -97,6 +112,56 @@ Failure LibraryFailure(std::string attempted, std::string hint)
     }
     if (!failure.code)
         failure.reason = "the library gives no reason";
+    return failure;
+}
+
+void Must(bool condition, const std::string &attempted, const std::string &hint)
+{
+    if (!condition)
+        throw LibraryFailure(attempted, hint);
+}
+
+Failure SystemFailure(std::string attempted, int error)
+{
+    return {.attempted = std::move(attempted),
+            .reason = std::strerror(error),
+            .status = error == ENOENT                     ? exit_not_found
+                      : error == EACCES || error == EPERM ? exit_denied
+                                                          : exit_failed};
+}
+
+Failure BusyFailure(std::string attempted, std::string reason, std::string hint)
+{
+    return {
+        .attempted = std::move(attempted), .reason = std::move(reason), .hint = std::move(hint), .status = exit_busy};
+}
+
+Failure WithPermissions(Failure failure)
+{
+    // Without a descriptor no lock can be had, whoever holds it.
+    const int probe = ::open("/dev/null", O_RDONLY | O_CLOEXEC);
+    if (probe >= 0)
+        ::close(probe);
+    if (failure.code && probe < 0 && (errno == EMFILE || errno == ENFILE)) {
+        failure.reason = "no file descriptor is left";
+        failure.hint = "raise the limit, ulimit -n";
+        failure.status = exit_failed;
+        return failure;
+    }
+    if (::geteuid() == 0 || failure.Status() == exit_usage || failure.Status() == exit_not_found)
+        return failure;
+    std::vector<std::string> needed = {failure.path};
+    if (failure.code == ERR_LOCK_FAILED || failure.code == ERR_CREATE_FAILED)
+        needed.insert(needed.end(), {"/tmp/lock/.", "/tmp/lock"});
+    if (failure.code == ERR_LOCK_FAILED || failure.code == ERR_OPEN_FAILED || failure.code == ERR_READ_FAILED)
+        needed.insert(needed.end(), {"/etc/shadow", "/usr/tavo/etc/private/smbpasswd"});
+    for (const std::string &path : needed)
+        if (!path.empty() && ::eaccess(path.c_str(), R_OK) != 0 && errno == EACCES) {
+            failure.reason = "no permission to open " + path;
+            failure.hint = "run it as root";
+            failure.status = exit_denied;
+            break;
+        }
     return failure;
 }
 

@@ -17,11 +17,12 @@ struct Failure {
     std::string module = {};  // where in the library; empty: not there
     int line = 0;
     std::optional<int> status = {};  // unless the code decides
+    std::string path = {};           // the file that could not be opened, where it is known
 
     int Status() const;
     std::string Hint() const;
-    std::string Text() const;  // one line, safe for a terminal
-    std::string Json() const;  // the same facts
+    std::string Text(bool verbose) const;  // one line, safe for a terminal; verbose: also where in the library
+    std::string Json() const;              // all of the facts
 };
 
 // The failure that the library has just reported.
@@ -29,6 +30,19 @@ Failure LibraryFailure(std::string attempted, std::string hint = {});
 
 // The hint of a failure for which the library sets no code.
 inline constexpr char log_hint[] = "look at the system log";
+
+// Throws the library's failure unless the condition, the success of a call, holds.
+void Must(bool condition, const std::string &attempted, const std::string &hint = {});
+
+// A failed system call, by its errno.
+Failure SystemFailure(std::string attempted, int error);
+
+// Something that is in use by somebody else.
+Failure BusyFailure(std::string attempted, std::string reason, std::string hint = {});
+
+// The same failure, as a lack of permission if that is its cause: the library reports a lock or file that may not be
+// opened like one that somebody holds.
+Failure WithPermissions(Failure failure);
 
 // An argument that tavoctl itself refuses.
 Failure UsageFailure(std::string attempted, std::string reason, std::string hint = {});

@@ -46,11 +46,11 @@ std::string LockName(const char *path)
     return std::string(at == std::string_view::npos ? whole : whole.substr(at + prefix.size()));
 }
 
-HeldLocks::HeldLocks(unsigned mask, bool shared, int timeout) : mask_(mask)
+HeldLocks::HeldLocks(unsigned mask, bool shared, int64_t timeout) : mask_(mask)
 {
     const unsigned way = TAVO_LOCK_NONBLOCKING | (shared ? TAVO_LOCK_SHARED : TAVO_LOCK_EXCLUSIVE);
     const std::string names = Names(mask);
-    if (!Take(mask | way, timeout, names))
+    if (!Take(mask | way, static_cast<int>(timeout), names))
         throw LibraryFailure("take the lock " + names);
 }
 

@@ -2,6 +2,7 @@
 #ifndef TAVOCTL_HELD_LOCKS_H
 #define TAVOCTL_HELD_LOCKS_H
 
+#include <cstdint>
 #include <string>
 
 namespace tavoctl {
@@ -15,7 +16,7 @@ std::string LockName(const char *path);
 // Takes every lock of mask in its constructor, or throws a Failure after timeout seconds; its destructor releases them.
 class HeldLocks {
   public:
-    HeldLocks(unsigned mask, bool shared, int timeout);
+    HeldLocks(unsigned mask, bool shared, int64_t timeout);
     ~HeldLocks();
     HeldLocks(const HeldLocks &) = delete;
     HeldLocks &operator=(const HeldLocks &) = delete;

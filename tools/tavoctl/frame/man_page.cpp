@@ -1,6 +1,7 @@
 // The man page, written from what the verbs declare.
 #include "frame/program.h"
 
+#include <cctype>
 #include <string_view>
 
 namespace tavoctl {
@@ -15,9 +16,10 @@ tavoctl \- read and change the state of the appliance
 [\fIOPTION\fR]... [\fIARGUMENT\fR]...
 .SH DESCRIPTION
 Verbs that read print an aligned table, or the same facts as JSON with \fB\-\-json\fR.
-Verbs that change something are silent when they succeed.
-On a machine without \fI/etc.defaults/tavoinfo.conf\fR they refuse, unless told \fB\-\-force\-host\fR.
-A failure is one line on standard error: what was attempted, the code, where in the library it arose, and a hint.
+Verbs that change something are silent when they succeed; with \fB\-\-json\fR they print what was changed.
+On a machine without \fI/etc.defaults/tavoinfo.conf\fR they refuse, unless \fB\-\-force\-host\fR was given.
+A failure is one line on standard error: what was attempted, why it failed, and a hint;
+\fB\-\-verbose\fR adds where in the library it arose.
 Control characters in values are shown as \fB\\xNN\fR.
 An argument that begins with a dash stands behind \fB\-\-\fR.
 )";
@@ -31,13 +33,16 @@ done
 failed
 .TP
 .B 2
-the command line is wrong, or the library refused an argument
+the command line or an argument is wrong
 .TP
 .B 3
-what was asked for is not there
+the object is not there
 .TP
 .B 4
-somebody else holds the lock or the device
+somebody else holds the lock or the device; trying again may help
+.TP
+.B 5
+permission denied
 .PP
 \fBlock run\fR and \fBproc run\fR give the exit status of the program that they ran;
 \fBlock run\fR gives 126 when it cannot be executed, 127 when it is not there, and 128 plus the number of the signal that
@@ -75,7 +80,7 @@ std::string Escaped(std::string_view text)
 std::string VerbText(const Family &family, const VerbEntry &entry)
 {
     const ReadyVerb verb(family, entry);
-    std::string text = ".SS \"" + Escaped(verb.Declared().Usage()) + "\"\n" + Escaped(entry.info.purpose) + "\n";
+    std::string text = ".SS \"" + Escaped(verb.Declared().Usage()) + "\"\n" + Escaped(entry.purpose) + "\n";
     for (const bool positional : {true, false}) {
         for (const ArgumentText &argument : verb.Declared().Texts()) {
             if (argument.positional != positional)
@@ -87,8 +92,8 @@ std::string VerbText(const Family &family, const VerbEntry &entry)
             text += "\n" + Escaped(argument.help) + "\n";
         }
     }
-    if (*entry.info.examples)
-        text += ".PP\nExamples:\n.PP\n.nf\n.RS\n" + Escaped(entry.info.examples) + "\n.RE\n.fi\n";
+    if (!entry.examples.empty())
+        text += ".PP\nExamples:\n.PP\n.nf\n.RS\n" + Escaped(entry.examples) + "\n.RE\n.fi\n";
     return text;
 }
 
@@ -104,6 +109,21 @@ std::string ManPage(const Program &program)
     }
     page += tail;
     return page;
+}
+
+std::string ManPage(const Family &family)
+{
+    std::string name = family.Name();
+    for (char &c : name)
+        c = static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
+    std::string page = ".TH TAVOCTL\\-" + name +
+                       " 1 \"\" \"tavoctl " TAVOCTL_VERSION "\" \"Appliance administration\"\n" +
+                       ".SH NAME\ntavoctl\\-" + Escaped(family.Name()) + " \\- " + Escaped(family.Purpose()) +
+                       "\n.SH SYNOPSIS\n.B tavoctl " + Escaped(family.Name()) +
+                       "\n.I VERB\n[\\fIOPTION\\fR]... [\\fIARGUMENT\\fR]...\n.SH VERBS\n";
+    for (const VerbEntry &entry : family.Verbs())
+        page += VerbText(family, entry);
+    return page + ".SH SEE ALSO\n.BR tavoctl (1)\n";
 }
 
 }  // namespace tavoctl

@@ -17,7 +17,7 @@ namespace tavoctl {
 namespace {
 
 constexpr std::size_t longest = 1024;
-constexpr char hint[] = "type one, send it as the first line of standard input, or say --empty-password";
+constexpr char password_hint[] = "type one, send it as the first line of standard input, or say --empty-password";
 
 termios shown;
 
@@ -100,7 +100,7 @@ std::string AskPassword(const std::string &name)
     const bool terminal = ::isatty(STDIN_FILENO) && ::isatty(STDERR_FILENO);
     std::string password = terminal ? ReadHidden("Password of " + name + ": ") : ReadLine();
     if (password.empty())
-        throw UsageFailure("set the password of " + name, "none was given", hint);
+        throw UsageFailure("set the password of " + name, "none was given", password_hint);
     if (terminal && ReadHidden("Again: ") != password)
         throw Failure{.attempted = "set the password of " + name, .reason = "the two differ"};
     return password;

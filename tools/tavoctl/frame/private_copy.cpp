@@ -2,13 +2,13 @@
 #include "frame/private_copy.h"
 
 #include "frame/failure.h"
+#include "frame/input_file.h"
 #include "frame/unified_diff.h"
 
 #include <cerrno>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
-#include <sstream>
 
 #include <cstdlib>
 #include <sys/stat.h>
@@ -22,30 +22,19 @@ Failure CannotRead(const std::string &path, const std::string &reason)
     return {.attempted = "read " + path, .reason = reason};
 }
 
-std::string ReadAll(const std::string &path)
-{
-    std::ifstream in(path, std::ios::binary);
-    std::ostringstream text;
-    if (in.peek() != std::ifstream::traits_type::eof())
-        text << in.rdbuf();
-    if (!in.is_open() || in.bad() || !text)
-        throw CannotRead(path, std::strerror(errno));
-    return text.str();
-}
-
 // True when it is there; a file that could not be made is a failure now, not when it is meant seriously.
 bool Exists(const std::string &path)
 {
     struct stat state = {};
     if (::stat(path.c_str(), &state) == 0) {
         if (!S_ISREG(state.st_mode))
-            throw CannotRead(path, "it is no regular file");
+            throw CannotRead(path, "not a regular file");
         return true;
     }
     if (errno != ENOENT)
-        throw CannotRead(path, std::strerror(errno));
+        throw SystemFailure("read " + path, errno);
     const std::filesystem::path folder = std::filesystem::absolute(path).parent_path();
-    if (::access(folder.c_str(), W_OK) != 0)
+    if (::eaccess(folder.c_str(), W_OK) != 0)
         throw Failure{.attempted = "create " + path, .reason = folder.string() + ": " + std::strerror(errno)};
     return false;
 }
@@ -55,7 +44,7 @@ bool Exists(const std::string &path)
 PrivateCopy::PrivateCopy(std::string original) : original_(std::move(original)), existed_(Exists(original_))
 {
     if (existed_)
-        text_ = ReadAll(original_);
+        text_ = ReadWhole(original_);
     char folder[] = "/tmp/tavoctl.XXXXXX";
     if (!::mkdtemp(folder))
         throw Failure{.attempted = "make a private copy of " + original_, .reason = std::strerror(errno)};
@@ -79,7 +68,7 @@ PrivateCopy::~PrivateCopy()
 std::string PrivateCopy::Difference() const
 {
     const bool exists = std::filesystem::exists(copy_);
-    return UnifiedDiff(text_, exists ? ReadAll(copy_) : "", existed_ ? original_ : "/dev/null", original_);
+    return UnifiedDiff(text_, exists ? ReadWhole(copy_) : "", existed_ ? original_ : "/dev/null", original_);
 }
 
 }  // namespace tavoctl

@@ -4,14 +4,20 @@
 #include "families.h"
 #include "frame/failure.h"
 #include "frame/host.h"
+#include "frame/suggestion.h"
+#include "frame/terminal_text.h"
 
 #include "tavo_error.h"
 
 #include <algorithm>
+#include <cctype>
 #include <exception>
 #include <iostream>
 #include <new>
+#include <sstream>
 #include <utility>
+
+#include <unistd.h>
 
 namespace tavoctl {
 namespace {
@@ -26,40 +32,128 @@ bool IsHelp(const std::string &word)
     return word == "-h" || word == "--help" || word == "help";
 }
 
-int Report(const Failure &failure, bool json)
+int Report(const Failure &failure, const Call &call)
 {
+    const Failure known = WithPermissions(failure);
     std::cout.flush();
-    std::cerr << (json ? failure.Json() : failure.Text()) << "\n";
-    return failure.Status();
+    std::cerr << (call.json ? known.Json() : known.Text(call.verbose)) << "\n";
+    return known.Status();
+}
+
+int ReportUsage(const std::string &reason, const std::string &hint)
+{
+    return Report(UsageFailure("understand the command line", reason, hint), {});
+}
+
+// Before a verb runs: on this machine, by this user?
+void RefuseWithoutRights(const VerbEntry &entry, const Call &call)
+{
+    if (!(entry.traits & changes) || call.dry_run)
+        return;
+    if (!call.force_host)
+        RefuseForeignHost();
+    if (!(entry.traits & by_anybody) && ::geteuid() != 0)
+        throw Failure{.attempted = "change this machine",
+                      .reason = "permission denied",
+                      .hint = "run it as root",
+                      .status = exit_denied};
+}
+
+void PrintReport(const Call &call)
+{
+    if (call.json)
+        std::cout << call.report.Json() << "\n";
+    else
+        std::cout << (::isatty(STDOUT_FILENO) ? Printable(call.report.Text(), true) : call.report.Text());
+}
+
+// The columns that --output names.
+std::vector<std::string> ChosenColumns(const std::string &list, const std::vector<ColumnFacts> &columns)
+{
+    std::vector<std::string> known, chosen;
+    for (const ColumnFacts &column : columns)
+        known.emplace_back(column.name);
+    std::istringstream names(list);
+    for (std::string name; std::getline(names, name, ',');) {
+        for (char &c : name)
+            c = c == ' ' ? '_' : static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+        if (std::count(known.begin(), known.end(), name) == 0)
+            throw UsageFailure("take " + name + " as --output", "there is no such column",
+                               DidYouMean(name, known, "allowed: " + Joined(known, ", ")));
+        chosen.push_back(name);
+    }
+    if (chosen.empty())
+        throw UsageFailure("take " + list + " as --output", "no column is named", "allowed: " + Joined(known, ", "));
+    return chosen;
 }
 
 }  // namespace
 
+std::string VerbEntry::Summary() const
+{
+    // The full stop of "802.3ad" ends nothing.
+    const std::size_t stop = std::min(purpose.find(". "), purpose.find(".\n"));
+    const std::string sentence = purpose.substr(0, stop);
+    return sentence.ends_with('.') ? sentence.substr(0, sentence.size() - 1) : sentence;
+}
+
+void Family::Add(const char *name, unsigned traits, Answer answer, std::string_view text,
+                 Action (*declare)(Arguments &))
+{
+    const std::size_t gap = std::min(text.find("\n\n"), text.size());
+    verbs_.push_back({name, traits, std::move(answer), std::string(text.substr(0, gap)),
+                      std::string(text.substr(std::min(gap + 2, text.size()))), declare});
+}
+
+std::vector<std::string> Family::VerbNames() const
+{
+    std::vector<std::string> names;
+    for (const VerbEntry &verb : verbs_)
+        names.push_back(verb.name);
+    return names;
+}
+
 const VerbEntry *Family::Find(const std::string &name) const
 {
-    const auto found =
-        std::find_if(verbs_.begin(), verbs_.end(), [&](const VerbEntry &v) { return name == v.info.name; });
+    const auto found = std::find_if(verbs_.begin(), verbs_.end(), [&](const VerbEntry &v) { return name == v.name; });
     return found == verbs_.end() ? nullptr : &*found;
 }
 
 std::string Family::Command(const VerbEntry &verb) const
 {
-    return std::string("tavoctl ") + name_ + (*verb.info.name ? " " : "") + verb.info.name;
+    return std::string("tavoctl ") + name_ + (verb.name.empty() ? "" : " ") + verb.name;
 }
 
 ReadyVerb::ReadyVerb(const Family &family, const VerbEntry &entry)
-    : verb_(entry.make()), arguments_(family.Command(entry))
+    : arguments_(family.Command(entry)), action_(entry.declare(arguments_))
 {
-    verb_->Declare(arguments_);
-    const unsigned traits = entry.info.traits;
-    if (traits & tells_before)
-        arguments_.Flag("--dry-run", call_.dry_run, "change nothing and show the difference that it would make");
+    const unsigned traits = entry.traits;
+    if ((traits & tells_before) || (entry.ReportsChanges() && !(traits & runs_program)))
+        dry_run_ = arguments_.Flag("--dry-run", "change nothing and show what would change");
     if (traits & destroys)
-        arguments_.Flag("--yes", call_.yes, "do it without asking");
+        yes_ = arguments_.Flag("--yes", "do it without asking");
     if (traits & changes)
-        arguments_.Flag("--force-host", call_.force_host, "do it although this machine is no appliance");
-    arguments_.Flag("--json", call_.json,
-                    traits & changes ? "report a failure as JSON" : "print JSON; also report a failure so");
+        force_host_ = arguments_.Flag("--force-host", "do it although this machine is not an appliance");
+    json_ = arguments_.Flag("--json", entry.ReportsChanges() ? "print what was changed, or a failure, as JSON"
+                                      : (traits & changes)   ? "report a failure as JSON"
+                                                             : "print JSON; also report a failure so");
+    if (entry.answer.form == Answer::list) {
+        output_ = arguments_.Option("--output", "COLUMNS", any_text, "the columns of the table, joined by commas");
+        no_headings_ = arguments_.Flag("--noheadings", "print the table without its headings");
+    }
+    verbose_ = arguments_.Flag("--verbose", "name the place in the library where a failure was found");
+}
+
+Call ReadyVerb::Called() const
+{
+    Call call;
+    call.json = *json_;
+    call.dry_run = call.report.dry_run = *dry_run_;
+    call.yes = *yes_;
+    call.force_host = *force_host_;
+    call.verbose = *verbose_;
+    call.style.headings = !*no_headings_;
+    return call;
 }
 
 Program::Program()
@@ -89,19 +183,15 @@ int Program::Run(std::vector<std::string> words) const
     }
     if (first == "--version")
         return Run({"version"});
-    if (first == "--man-page") {
-        std::cout << ManPage(*this);
+    if (RunForTools(words))
         return exit_done;
-    }
-    if (first == "--complete") {
-        for (const std::string &candidate : Complete(*this, Tail(words, 1)))
-            std::cout << candidate << "\n";
-        return exit_done;
-    }
     const Family *family = Find(first);
     if (!family) {
         const std::string reason = first.empty() ? "a family is required" : "there is no family " + first;
-        return Report(UsageFailure("understand the command line", reason, "see tavoctl --help"), false);
+        std::vector<std::string> names;
+        for (const auto &known : families_)
+            names.emplace_back(known->Name());
+        return ReportUsage(reason, DidYouMean(first, names, "see tavoctl --help"));
     }
     if (const VerbEntry *only = family->Find(""))
         return RunVerb(*family, *only, Tail(words, 1));
@@ -113,33 +203,65 @@ int Program::Run(std::vector<std::string> words) const
     const VerbEntry *verb = second.empty() ? nullptr : family->Find(second);
     if (!verb) {
         const std::string reason = second.empty() ? "a verb is required" : "there is no verb " + first + " " + second;
-        return Report(UsageFailure("understand the command line", reason, "see tavoctl " + first + " --help"), false);
+        return ReportUsage(reason, DidYouMean(second, family->VerbNames(), "see tavoctl " + first + " --help"));
     }
     return RunVerb(*family, *verb, Tail(words, 2));
 }
 
+// What other programs ask: the build, shells, tests.
+bool Program::RunForTools(const std::vector<std::string> &words) const
+{
+    const std::string first = words.empty() ? "" : words[0];
+    if (first == "--man-page" && words.size() > 1 && Find(words[1]))
+        std::cout << ManPage(*Find(words[1]));
+    else if (first == "--man-page")
+        std::cout << ManPage(*this);
+    else if (first == "--registry")
+        std::cout << RegistryJson(*this) << "\n";
+    else if (first == "--manual")
+        std::cout << ManualText(*this);
+    else if (first == "--schemas" && words.size() == 2)
+        WriteSchemas(*this, words[1]);
+    else if (first == "--complete")
+        for (const std::string &candidate : Complete(*this, Tail(words, 1)))
+            std::cout << candidate << "\n";
+    else
+        return false;
+    return true;
+}
+
 int Program::RunVerb(const Family &family, const VerbEntry &entry, std::vector<std::string> words) const
 {
+    Call call;
     ReadyVerb verb(family, entry);
     try {
-        if (!verb.Declared().Parse(std::move(words))) {
-            std::cout << VerbHelp(family, entry);
-            return exit_done;
+        try {
+            if (!verb.Declared().Parse(std::move(words))) {
+                std::cout << VerbHelp(family, entry);
+                return exit_done;
+            }
+        } catch (const Failure &) {
+            call = verb.Called();
+            throw;
         }
-        if ((entry.info.traits & changes) && !verb.Common().dry_run && !verb.Common().force_host)
-            RefuseForeignHost();
+        call = verb.Called();
+        if (verb.Output())
+            call.style.columns = ChosenColumns(*verb.Output(), entry.answer.columns);
+        RefuseWithoutRights(entry, call);
         TLIBErrSet(ERR_SUCCESS);
-        const int status = verb.Run();
-        // An answer that did not arrive is no answer.
+        verb.Run()(call);
+        if (entry.ReportsChanges() && (call.json || call.dry_run))
+            PrintReport(call);
+        // An answer that did not arrive is not an answer.
         if (!std::cout.flush())
             throw Failure{.attempted = "write to standard output", .reason = "it is full or closed"};
-        return status;
+        return call.status;
     } catch (const Failure &failure) {
-        return Report(failure, verb.Common().json);
+        return Report(failure, call);
     } catch (const std::bad_alloc &) {
-        return Report({.attempted = "go on", .code = ERR_OUT_OF_MEMORY}, verb.Common().json);
+        return Report({.attempted = "go on", .code = ERR_OUT_OF_MEMORY}, call);
     } catch (const std::exception &error) {
-        return Report({.attempted = "go on", .reason = error.what()}, verb.Common().json);
+        return Report({.attempted = "go on", .reason = error.what()}, call);
     }
 }
 

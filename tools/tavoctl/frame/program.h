@@ -6,31 +6,52 @@
 
 #include <memory>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace tavoctl {
 
 struct VerbEntry {
-    VerbInfo info;
-    std::unique_ptr<Verb> (*make)();
+    std::string name;  // "" for a family that is one command
+    unsigned traits;
+    Answer answer;
+    std::string purpose;
+    std::string examples;  // a command a line
+    std::function<Action(Arguments &)> declare;
+
+    std::string Summary() const;  // the first sentence, without its full stop
+    bool ReportsChanges() const { return answer.form == Answer::change; }
 };
 
 class Family {
   public:
     Family(const char *name, const char *purpose) : name_(name), purpose_(purpose) {}
 
+    // The text is what the verb does, an empty line, and examples, a command a line.
+    void Add(const char *name, unsigned traits, Answer answer, std::string_view text, Action (*declare)(Arguments &));
+
     // NewVerb is a Verb with a static constexpr VerbInfo named info.
     template <class NewVerb>
     void Add()
     {
-        verbs_.push_back({NewVerb::info, []() -> std::unique_ptr<Verb> {
-                              return std::make_unique<NewVerb>();
+        verbs_.push_back({NewVerb::info.name,
+                          NewVerb::info.traits,
+                          {},
+                          NewVerb::info.purpose,
+                          NewVerb::info.examples,
+                          [](Arguments &in) -> Action {
+                              const auto verb = std::make_shared<NewVerb>();
+                              verb->Declare(in);
+                              return [verb](Call &call) {
+                                  call.status = verb->Run(call);
+                              };
                           }});
     }
 
     const char *Name() const { return name_; }
     const char *Purpose() const { return purpose_; }
     const std::vector<VerbEntry> &Verbs() const { return verbs_; }
+    std::vector<std::string> VerbNames() const;
     const VerbEntry *Find(const std::string &name) const;
     // "tavoctl conf set"
     std::string Command(const VerbEntry &verb) const;
@@ -48,13 +69,16 @@ class ReadyVerb {
 
     Arguments &Declared() { return arguments_; }
     const Arguments &Declared() const { return arguments_; }
-    const Call &Common() const { return call_; }
-    int Run() { return verb_->Run(call_); }
+    // The common options, once the arguments are parsed.
+    Call Called() const;
+    const std::optional<std::string> &Output() const { return *output_; }
+    const Action &Run() const { return action_; }
 
   private:
-    std::unique_ptr<Verb> verb_;
-    Call call_;
     Arguments arguments_;
+    Action action_;
+    Given<bool> json_, dry_run_, yes_, force_host_, verbose_, no_headings_;
+    Given<std::optional<std::string>> output_;
 };
 
 class Program {
@@ -69,6 +93,7 @@ class Program {
 
   private:
     int RunVerb(const Family &family, const VerbEntry &entry, std::vector<std::string> words) const;
+    bool RunForTools(const std::vector<std::string> &words) const;
     std::string Help() const;
 
     std::vector<std::unique_ptr<Family>> families_;
@@ -77,11 +102,23 @@ class Program {
 std::string FamilyHelp(const Family &family);
 std::string VerbHelp(const Family &family, const VerbEntry &entry);
 
-// The man page, in man(7) macros.
+// The man page, in man(7) macros: of the program, or of one family.
 std::string ManPage(const Program &program);
+std::string ManPage(const Family &family);
 
 // What may stand in the place of the last word, one candidate each.
 std::vector<std::string> Complete(const Program &program, std::vector<std::string> words);
+
+// The JSON Schema of a verb's answer, or of a failure for no verb.
+std::string SchemaOf(const Family *family, const VerbEntry *entry);
+// Writes all of them into a folder, a file each: conf-get.json, error.json.
+void WriteSchemas(const Program &program, const std::string &folder);
+
+// The verbs with their traits and arguments as JSON.
+std::string RegistryJson(const Program &program);
+
+// The part of the manual that lists the verbs and the fields of their answers.
+std::string ManualText(const Program &program);
 
 }  // namespace tavoctl
 

@@ -2,9 +2,9 @@
 #include "frame/settings_file.h"
 
 #include "frame/containers.h"
+#include "frame/held_locks.h"
 #include "frame/host.h"
 #include "frame/private_copy.h"
-#include "frame/terminal_text.h"
 
 #include "tavo_file.h"
 #include "tavo_lock.h"
@@ -12,7 +12,6 @@
 
 #include <cerrno>
 #include <filesystem>
-#include <iostream>
 
 #include <unistd.h>
 
@@ -34,58 +33,70 @@ bool IsSystemSettings(const std::string &path)
     return fs::absolute(path, error).lexically_normal() == settings_file;
 }
 
-void ShowDryRun(const std::string &path, const std::function<void(const char *)> &edit)
+void RefuseUnwritable(const std::string &path)
 {
-    const PrivateCopy copy(path);
-    edit(copy.Path().c_str());
-    const std::string diff = copy.Difference();
-    std::cout << (::isatty(STDOUT_FILENO) ? Printable(diff, true) : diff);
+    const bool there = ::eaccess(path.c_str(), F_OK) == 0;
+    const std::filesystem::path folder = std::filesystem::absolute(path).parent_path();
+    if (::eaccess(there ? path.c_str() : folder.c_str(), W_OK) != 0 && errno == EACCES)
+        throw Failure{.attempted = "change " + path,
+                      .reason = "permission denied",
+                      .hint = "run it as root",
+                      .status = exit_denied};
 }
 
 }  // namespace
 
-void SettingsFile::DeclareSystem(Arguments &arguments, bool changes)
+SettingsFile SettingsFile::OfSystem(Arguments &in, unsigned trait)
 {
-    arguments.Option("--file", "PATH", path_, std::string("the file (") + settings_file + ")");
-    arguments.Flag("--defaults", defaults_, std::string("the factory settings, ") + defaults_file);
-    if (changes)
-        arguments.Number("--timeout", "SECONDS", wait_, "how long to wait for the lock of the system settings (5)");
+    SettingsFile file;
+    file.file_ = in.Option("--file", "PATH", file_path, std::string("the file (") + settings_file + ")");
+    file.defaults_ = in.Flag("--defaults", std::string("the factory settings, ") + defaults_file);
+    if (trait & changes)
+        file.timeout_ = in.Number("--timeout", "SECONDS", "how long to wait for the lock of the system settings (5)");
+    return file;
 }
 
-void SettingsFile::DeclareAny(Arguments &arguments, bool changes)
+SettingsFile SettingsFile::Any(Arguments &in, unsigned trait)
 {
-    must_be_named_ = true;
-    arguments.Option("--file", "PATH", path_, "the file; required");
-    if (changes)
-        arguments.Number("--timeout", "SECONDS", wait_,
-                         std::string("how long to wait for the lock if it is ") + settings_file + " (5)");
+    SettingsFile file;
+    file.must_be_named_ = true;
+    file.file_ = in.Option("--file", "PATH", file_path, "the file; required");
+    if (trait & changes)
+        file.timeout_ = in.Number("--timeout", "SECONDS",
+                                  std::string("how long to wait for the lock if it is ") + settings_file + " (5)");
+    return file;
 }
 
-const std::string &SettingsFile::Path()
+std::string SettingsFile::Path() const
 {
-    if (defaults_ && !path_.empty())
+    if (*defaults_ && *file_)
         throw UsageFailure("choose a file", "--file and --defaults name two");
-    if (path_.empty() && must_be_named_)
+    if (!*file_ && must_be_named_)
         throw UsageFailure("choose a file", "--file PATH is required");
-    if (path_.empty())
-        path_ = defaults_ ? defaults_file : settings_file;
-    return path_;
+    return file_->value_or(*defaults_ ? defaults_file : settings_file);
 }
 
-void SettingsFile::Change(const Call &call, const std::function<void(const char *)> &edit)
+void SettingsFile::Change(Call &call, const std::function<void(const char *)> &edit, const std::string &question) const
 {
-    const std::string &path = Path();
-    if (call.dry_run)
-        return ShowDryRun(path, edit);
+    const std::string path = Path();
     std::optional<HeldLocks> lock;
-    if (IsSystemSettings(path))
-        lock.emplace(TAVO_LOCK_TAVOINFO, false, wait_);
-    edit(path.c_str());
+    if (!call.dry_run)
+        RefuseUnwritable(path);
+    if (!call.dry_run && IsSystemSettings(path))
+        lock.emplace(TAVO_LOCK_TAVOINFO, false, timeout_->value_or(usual_wait));
+    {
+        const PrivateCopy copy(path);
+        edit(copy.Path().c_str());
+        call.report.diff = copy.Difference();
+    }
+    if (call.Proceed(question))
+        edit(path.c_str());
 }
 
-Failure SettingsFile::Failed(const std::string &attempted)
+Failure SettingsFile::Failed(const std::string &attempted, const std::string &hint) const
 {
-    Failure failure = LibraryFailure(attempted);
+    Failure failure = LibraryFailure(attempted, hint);
+    failure.path = Path();
     if (failure.code == ERR_OPEN_FAILED && IsMissing(Path())) {
         failure.reason = "there is no such file";
         failure.hint = "check the path";
@@ -94,12 +105,24 @@ Failure SettingsFile::Failed(const std::string &attempted)
     return failure;
 }
 
-std::vector<std::string> SettingsFile::Lines()
+std::vector<std::string> SettingsFile::Lines() const
 {
     StringList lines;
     if (TLIBFileReadLines(Path().c_str(), lines.Address()) < 0)
         throw Failed("read " + Path());
     return lines.Items();
+}
+
+std::vector<std::string> SettingsFile::Keys() const
+{
+    StringList lines;
+    std::vector<std::string> keys;
+    if (TLIBFileReadLines(Path().c_str(), lines.Address()) < 0)
+        return keys;
+    for (const std::string &line : lines.Items())
+        if (const auto setting = SplitSetting(line))
+            keys.push_back(setting->first);
+    return keys;
 }
 
 std::optional<std::pair<std::string, std::string>> SplitSetting(std::string line)
@@ -115,12 +138,18 @@ std::optional<std::pair<std::string, std::string>> SplitSetting(std::string line
     return std::pair<std::string, std::string>(key, value.c_str());
 }
 
-std::pair<std::string, std::string> PairArgument(const std::string &argument)
+const ArgumentKind setting_pair = {
+    .name = "setting",
+    .allowed = "KEY=VALUE",
+    .valid = [](const std::string &pair) { return pair.find('=') != std::string::npos && pair.find('=') > 0; },
+    .sample = "key=value",
+    .wrong = "no pair",
+};
+
+std::pair<std::string, std::string> SplitPair(const std::string &pair)
 {
-    const std::size_t sign = argument.find('=');
-    if (sign == std::string::npos || sign == 0)
-        throw UsageFailure("set " + argument, "it is not of the form KEY=VALUE");
-    return {argument.substr(0, sign), argument.substr(sign + 1)};
+    const std::size_t sign = pair.find('=');
+    return {pair.substr(0, sign), pair.substr(sign + 1)};
 }
 
 }  // namespace tavoctl

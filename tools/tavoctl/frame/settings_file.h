@@ -2,9 +2,7 @@
 #ifndef TAVOCTL_SETTINGS_FILE_H
 #define TAVOCTL_SETTINGS_FILE_H
 
-#include "frame/arguments.h"
 #include "frame/failure.h"
-#include "frame/held_locks.h"
 #include "frame/verb.h"
 
 #include <functional>
@@ -17,35 +15,39 @@ namespace tavoctl {
 
 class SettingsFile {
   public:
-    // Options of a verb that addresses /etc/tavoinfo.conf unless told otherwise, or always the file that it is told.
-    void DeclareSystem(Arguments &arguments, bool changes);
-    void DeclareAny(Arguments &arguments, bool changes);
+    // Declares the options of a verb that addresses /etc/tavoinfo.conf unless another file is given, or always the file
+    // that is given.
+    static SettingsFile OfSystem(Arguments &in, unsigned trait);
+    static SettingsFile Any(Arguments &in, unsigned trait);
 
     // Throws a Failure when the options name no file, or two.
-    const std::string &Path();
+    std::string Path() const;
 
-    // Calls edit with the path of the file, under the file's lock; with --dry-run with that of a private copy, and
-    // prints the difference that it made there.
-    void Change(const Call &call, const std::function<void(const char *path)> &edit);
+    // Calls edit with the path of a private copy, and then, if that made a difference, with the path of the file, under
+    // the file's lock; not with --dry-run.
+    void Change(Call &call, const std::function<void(const char *path)> &edit, const std::string &question = {}) const;
 
     // The library's last failure; "not found" when the whole file is missing. For what does not create the file.
-    Failure Failed(const std::string &attempted);
+    Failure Failed(const std::string &attempted, const std::string &hint = {}) const;
 
     // Every line, without its newline.
-    std::vector<std::string> Lines();
+    std::vector<std::string> Lines() const;
+    // The names of its settings; none where it cannot be read.
+    std::vector<std::string> Keys() const;
 
   private:
-    std::string path_;
-    bool defaults_ = false;
     bool must_be_named_ = false;
-    int wait_ = usual_wait;
+    Given<std::optional<std::string>> file_;
+    Given<bool> defaults_;
+    Given<std::optional<int64_t>> timeout_;
 };
 
 // The key and value of a line as the library reads it; empty for a line that sets nothing.
 std::optional<std::pair<std::string, std::string>> SplitSetting(std::string line);
 
 // "KEY=VALUE" as an argument of the command line.
-std::pair<std::string, std::string> PairArgument(const std::string &argument);
+extern const ArgumentKind setting_pair;
+std::pair<std::string, std::string> SplitPair(const std::string &pair);
 
 }  // namespace tavoctl
 

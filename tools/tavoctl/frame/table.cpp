@@ -1,31 +1,30 @@
 // Aligned text and JSON from the same facts.
 #include "frame/table.h"
 
+#include "frame/terminal.h"
 #include "frame/terminal_text.h"
 
+#include <libsmartcols.h>
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <cctype>
 #include <cstdio>
+#include <cstdlib>
 #include <iterator>
+#include <memory>
+#include <new>
 
 namespace tavoctl {
 namespace {
+
+constexpr char column_separator[] = "  ";
 
 std::string Heading(std::string name)
 {
     for (char &c : name)
         c = c == '_' ? ' ' : static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
     return name;
-}
-
-std::string Joined(const std::vector<std::string> &texts)
-{
-    std::string joined;
-    for (const std::string &text : texts)
-        joined += (joined.empty() ? "" : ",") + text;
-    return joined;
 }
 
 std::string Readable(Bytes bytes)
@@ -40,13 +39,6 @@ std::string Readable(Bytes bytes)
     return text;
 }
 
-// The text in a column of that width; the last column of a line has no blanks behind it.
-std::string Padded(const std::string &text, std::size_t width, bool to_the_right, bool last)
-{
-    const std::string blanks(width - std::min(width, Columns(text)), ' ');
-    return to_the_right ? blanks + text : last ? text : text + blanks;
-}
-
 nlohmann::ordered_json ToJson(const Cell &cell)
 {
     return std::visit(
@@ -58,16 +50,105 @@ nlohmann::ordered_json ToJson(const Cell &cell)
             else
                 return value;
         },
-        cell.Value());
+        cell.Get());
 }
 
-// Bytes that are no UTF-8 show as the replacement character.
-std::string Dump(const nlohmann::ordered_json &facts)
+nlohmann::ordered_json NewDocument()
 {
-    return facts.dump(2, ' ', true, nlohmann::ordered_json::error_handler_t::replace);
+    return {{"format_version", format_version}};
 }
+
+// Bytes that are not UTF-8 show as the replacement character.
+std::string Dump(const nlohmann::ordered_json &facts, bool one_line = false)
+{
+    return facts.dump(one_line ? -1 : 2, ' ', true, nlohmann::ordered_json::error_handler_t::replace);
+}
+
+// Words about health that are worth a colour.
+const char *ColourOf(const std::string &word)
+{
+    constexpr std::pair<const char *, const char *> colours[] = {
+        {"normal", "green"}, {"good", "green"},  {"degraded", "yellow"}, {"standby", "cyan"},
+        {"failing", "red"},  {"crashed", "red"}, {"failed", "red"},      {"foreign", "yellow"},
+    };
+    for (const auto &[known, colour] : colours)
+        if (word == known)
+            return colour;
+    return nullptr;
+}
+
+struct FreeTable {
+    void operator()(libscols_table *table) const { scols_unref_table(table); }
+};
+
+// A table of libsmartcols that is as wide as the terminal.
+class Grid {
+  public:
+    Grid() : table_(scols_new_table())
+    {
+        if (!table_)
+            throw std::bad_alloc();
+        scols_table_enable_noencoding(table_.get(), 1);  // every text is printable already
+        scols_table_set_column_separator(table_.get(), column_separator);
+        scols_table_enable_colors(table_.get(), Terminal::HasColours());
+        const int width = Terminal::Width();
+        scols_table_set_termforce(table_.get(), width ? SCOLS_TERMFORCE_ALWAYS : SCOLS_TERMFORCE_NEVER);
+        if (width)
+            scols_table_set_termwidth(table_.get(), static_cast<std::size_t>(width));
+    }
+
+    void HideHeadings() { scols_table_enable_noheadings(table_.get(), 1); }
+
+    void AddColumn(const std::string &heading, int flags)
+    {
+        if (!scols_table_new_column(table_.get(), heading.c_str(), 0, flags))
+            throw std::bad_alloc();
+    }
+
+    libscols_line *AddLine(libscols_line *parent = nullptr)
+    {
+        libscols_line *line = scols_table_new_line(table_.get(), parent);
+        if (!line)
+            throw std::bad_alloc();
+        return line;
+    }
+
+    static void Set(libscols_line *line, std::size_t column, const std::string &text)
+    {
+        if (scols_line_set_data(line, column, text.c_str()) != 0)
+            throw std::bad_alloc();
+        if (const char *colour = ColourOf(text))
+            scols_cell_set_color(scols_line_get_cell(line, column), colour);
+    }
+
+    std::string Text() const
+    {
+        char *text = nullptr;
+        if (scols_print_table_to_string(table_.get(), &text) != 0)
+            throw std::bad_alloc();
+        const std::unique_ptr<char, decltype(&std::free)> owner(text, std::free);
+        std::string whole = text ? text : "";
+        if (!whole.empty() && !whole.ends_with('\n'))
+            whole += '\n';
+        return whole;
+    }
+
+  private:
+    std::unique_ptr<libscols_table, FreeTable> table_;
+};
 
 }  // namespace
+
+// Not in the header: there the compiler for 32-bit ARM warns of parts of the fact that its kind does not have.
+Cell::Cell(std::string text) : value_(std::move(text))
+{
+}
+Cell::Cell(const char *text) : value_(std::string(text))
+{
+}
+Cell::Cell(std::vector<std::string> texts) : value_(std::move(texts))
+{
+}
 
 std::string Cell::Text() const
 {
@@ -80,17 +161,19 @@ std::string Cell::Text() const
     if (const auto *bytes = std::get_if<Bytes>(&value_))
         return Readable(*bytes);
     if (const auto *texts = std::get_if<std::vector<std::string>>(&value_))
-        return texts->empty() ? "-" : Printable(Joined(*texts));
+        return texts->empty() ? "-" : Printable(Joined(*texts, ","));
     return "-";
 }
 
 std::string Cell::Csv() const
 {
     std::string text;
-    if (const auto *bytes = std::get_if<std::string>(&value_))
-        text = *bytes;
+    if (const auto *plain = std::get_if<std::string>(&value_))
+        text = *plain;
     else if (const auto *texts = std::get_if<std::vector<std::string>>(&value_))
-        text = Joined(*texts);
+        text = Joined(*texts, ",");
+    else if (const auto *bytes = std::get_if<Bytes>(&value_))
+        text = std::to_string(bytes->count);
     else if (!std::holds_alternative<std::monostate>(value_))
         text = Text();
     if (text.find_first_of(",\"\r\n") == std::string::npos)
@@ -101,63 +184,85 @@ std::string Cell::Csv() const
     return quoted + "\"";
 }
 
-std::string Table::Text() const
+Table::Table(const std::vector<std::string> &names) : names_(names)
 {
-    if (rows_.empty())
-        return {};
-    std::vector<std::vector<std::string>> lines(1);
-    for (const std::string &column : columns_)
-        lines[0].push_back(Heading(column));
-    for (const auto &row : rows_) {
-        lines.emplace_back();
-        for (const Cell &cell : row)
-            lines.back().push_back(cell.Text());
+    for (const std::string &name : names_)
+        columns_.push_back({name.c_str(), "", Kind::any, true, in_list, ""});
+}
+
+void Table::Add(std::vector<Cell> row, int parent)
+{
+    rows_.push_back({std::move(row), parent});
+}
+
+std::string Table::Text(const TableStyle &style) const
+{
+    std::vector<std::size_t> shown;
+    for (const std::string &name : style.columns)
+        for (std::size_t i = 0; i < columns_.size(); ++i)
+            if (name == columns_[i].name)
+                shown.push_back(i);
+    for (std::size_t i = 0; i < columns_.size() && style.columns.empty(); ++i)
+        if (columns_[i].place == in_list)
+            shown.push_back(i);
+    if (rows_.empty()) {
+        std::string line;
+        for (const std::size_t i : shown)
+            line += (line.empty() ? "" : column_separator) + Heading(columns_[i].name);
+        return style.headings ? line + "\n" : "";
     }
 
-    std::vector<std::size_t> widths(columns_.size());
-    std::vector<bool> numbers(columns_.size());
-    for (std::size_t i = 0; i < columns_.size(); ++i) {
-        for (const auto &line : lines)
-            widths[i] = std::max(widths[i], Columns(line[i]));
-        numbers[i] = std::all_of(rows_.begin(), rows_.end(), [i](const auto &row) { return row[i].IsNumber(); });
+    const bool tree = std::any_of(rows_.begin(), rows_.end(), [](const Row &row) { return row.parent >= 0; });
+    Grid grid;
+    if (!style.headings)
+        grid.HideHeadings();
+    for (const std::size_t i : shown) {
+        const bool right = std::all_of(rows_.begin(), rows_.end(), [i](const Row &r) { return r.cells[i].IsNumber(); });
+        const bool free = columns_[i].kind == Kind::text || columns_[i].kind == Kind::texts ||
+                          (columns_[i].kind == Kind::any && !right);
+        grid.AddColumn(style.headings ? Heading(columns_[i].name) : "", (tree && i == shown[0] ? SCOLS_FL_TREE
+                                                                         : free                ? SCOLS_FL_WRAP
+                                                                                               : 0) |
+                                                                            (right ? SCOLS_FL_RIGHT : 0));
     }
-
-    std::string text;
-    for (const auto &line : lines) {
-        for (std::size_t i = 0; i < columns_.size(); ++i) {
-            const bool last = i + 1 == columns_.size();
-            text += Padded(line[i], widths[i], numbers[i], last) + (last ? "\n" : "  ");
-        }
+    std::vector<libscols_line *> lines;
+    for (const Row &row : rows_) {
+        libscols_line *const parent = row.parent < 0 ? nullptr : lines[static_cast<std::size_t>(row.parent)];
+        lines.push_back(grid.AddLine(parent));
+        for (std::size_t i = 0; i < shown.size(); ++i)
+            Grid::Set(lines.back(), i, row.cells[shown[i]].Text());
     }
-    return text;
+    return grid.Text();
 }
 
 std::string Table::Csv() const
 {
     std::string text;
-    for (std::size_t i = 0; i < columns_.size(); ++i)
-        text += (i ? "," : "") + columns_[i];
-    for (const auto &row : rows_) {
+    for (const ColumnFacts &column : columns_)
+        text += (text.empty() ? "" : ",") + std::string(column.name);
+    for (const Row &row : rows_) {
         text += "\n";
-        for (std::size_t i = 0; i < row.size(); ++i)
-            text += (i ? "," : "") + row[i].Csv();
+        for (std::size_t i = 0; i < row.cells.size(); ++i)
+            text += (i ? "," : "") + row.cells[i].Csv();
     }
     return text + "\n";
 }
 
-std::string Table::Json() const
+std::string Table::Json(bool one_line) const
 {
-    auto rows = nlohmann::ordered_json::array();
-    for (const auto &row : rows_) {
+    auto items = nlohmann::ordered_json::array();
+    for (const Row &row : rows_) {
         auto object = nlohmann::ordered_json::object();
         for (std::size_t i = 0; i < columns_.size(); ++i)
-            object[columns_[i]] = ToJson(row[i]);
-        rows.push_back(std::move(object));
+            if (columns_[i].place != in_one)
+                object[columns_[i].name] = ToJson(row.cells[i]);
+        items.push_back(std::move(object));
     }
-    return Dump(rows);
+    nlohmann::ordered_json document = NewDocument();
+    document["items"] = std::move(items);
+    return Dump(document, one_line);
 }
 
-// Not in the header: there the compiler for 32-bit ARM warns of parts of the fact that its kind does not have.
 void Record::Add(std::string name, Cell value)
 {
     fields_.emplace_back(std::move(name), std::move(value));
@@ -165,24 +270,56 @@ void Record::Add(std::string name, Cell value)
 
 std::string Record::Text() const
 {
-    std::size_t width = 0;
-    for (const auto &[name, value] : fields_)
-        width = std::max(width, name.size());
-    std::string text;
+    Grid grid;
+    grid.HideHeadings();
+    grid.AddColumn("", 0);
+    grid.AddColumn("", SCOLS_FL_WRAP);
     for (const auto &[name, value] : fields_) {
-        std::string label = name;
+        std::string label = name + ":";
         std::replace(label.begin(), label.end(), '_', ' ');
-        text += Padded(label + ":", width + 1, false, false) + "  " + value.Text() + "\n";
+        libscols_line *const line = grid.AddLine();
+        Grid::Set(line, 0, label);
+        Grid::Set(line, 1, value.Text());
     }
-    return text;
+    return grid.Text();
 }
 
 std::string Record::Json() const
 {
-    auto object = nlohmann::ordered_json::object();
+    nlohmann::ordered_json document = NewDocument();
     for (const auto &[name, value] : fields_)
-        object[name] = ToJson(value);
-    return Dump(object);
+        document[name] = ToJson(value);
+    return Dump(document);
+}
+
+std::string ChangeReport::Text() const
+{
+    if (!diff.empty() || changes.empty())
+        return diff;
+    Table table(std::vector<std::string>{"object", "column", "old", "new"});
+    for (const Change &change : changes)
+        table.Add({change.object, change.column, change.before, change.after});
+    return table.Text();
+}
+
+std::string ChangeReport::Json() const
+{
+    nlohmann::ordered_json document = NewDocument();
+    document["changed"] = Changed();
+    if (dry_run)
+        document["dry_run"] = true;
+    for (const auto &[name, value] : chosen)
+        document[name] = ToJson(value);
+    auto list = nlohmann::ordered_json::array();
+    for (const Change &change : changes)
+        list.push_back({{"object", change.object},
+                        {"column", change.column},
+                        {"old", ToJson(change.before)},
+                        {"new", ToJson(change.after)}});
+    document["changes"] = std::move(list);
+    if (!diff.empty())
+        document["diff"] = diff;
+    return Dump(document);
 }
 
 }  // namespace tavoctl

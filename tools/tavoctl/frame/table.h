@@ -1,67 +1,61 @@
-// The facts that a reading verb shows: rows under columns, or the fields of one thing. Both print aligned text and, as
-// the same facts, JSON.
+// The facts that a verb shows: rows under columns, or the fields of one thing. Both print aligned text and, as the same
+// facts, JSON.
 #ifndef TAVOCTL_TABLE_H
 #define TAVOCTL_TABLE_H
 
-#include <cstdint>
+#include "frame/column.h"
+
+#include <initializer_list>
 #include <string>
 #include <utility>
-#include <variant>
 #include <vector>
 
 namespace tavoctl {
 
-// A size: "465.8 GiB" in a table, the number of bytes in JSON.
-struct Bytes {
-    uint64_t count;
+inline constexpr int format_version = 1;  // of every JSON document
+
+struct TableStyle {
+    bool headings = true;
+    std::vector<std::string> columns = {};  // by name, in this order; empty: those in the list
 };
-
-// One fact. The monostate is "not known": "-" in a table, null in JSON.
-class Cell {
-  public:
-    Cell() = default;
-    Cell(std::string text) : value_(std::move(text)) {}
-    Cell(const char *text) : value_(std::string(text)) {}
-    Cell(int number) : value_(int64_t{number}) {}
-    Cell(int64_t number) : value_(number) {}
-    Cell(bool truth) : value_(truth) {}
-    Cell(Bytes bytes) : value_(bytes) {}
-    Cell(std::vector<std::string> texts) : value_(std::move(texts)) {}
-
-    bool IsNumber() const { return std::holds_alternative<int64_t>(value_) || std::holds_alternative<Bytes>(value_); }
-    std::string Text() const;  // printable
-    std::string Csv() const;   // byte for byte; quoted where that is needed
-    const auto &Value() const { return value_; }
-
-  private:
-    std::variant<std::monostate, std::string, int64_t, bool, Bytes, std::vector<std::string>> value_;
-};
-
-// A text that is empty when it is not known.
-inline Cell Known(const std::string &text)
-{
-    return text.empty() ? Cell() : Cell(text);
-}
 
 class Table {
   public:
-    // The columns by their JSON names; the heading is that name in capitals.
-    explicit Table(std::vector<std::string> columns) : columns_(std::move(columns)) {}
+    explicit Table(std::vector<ColumnFacts> columns) : columns_(std::move(columns)) {}
+    explicit Table(const std::vector<std::string> &names);
+    explicit Table(std::initializer_list<const char *> names)
+        : Table(std::vector<std::string>(names.begin(), names.end()))
+    {
+    }
 
-    void Add(std::vector<Cell> row) { rows_.push_back(std::move(row)); }
+    // A row below another one in a tree, by the index of that one.
+    void Add(std::vector<Cell> row, int parent = -1);
     bool Empty() const { return rows_.empty(); }
 
-    std::string Text() const;  // numbers to the right; nothing at all without rows
-    std::string Csv() const;   // comma-separated values with a line of the columns' names
-    std::string Json() const;  // an array of objects
+    std::string Text(const TableStyle &style = {}) const;  // as wide as the terminal, or as it takes
+    std::string Csv() const;                               // comma-separated values with a line of the columns' names
+    std::string Json(bool one_line = false) const;         // {"format_version": 1, "items": [object, ...]}
 
   private:
-    std::vector<std::string> columns_;
-    std::vector<std::vector<Cell>> rows_;
+    struct Row {
+        std::vector<Cell> cells;
+        int parent;
+    };
+    std::vector<std::string> names_;  // of columns without facts of their own
+    std::vector<ColumnFacts> columns_;
+    std::vector<Row> rows_;
 };
 
 class Record {
   public:
+    Record() = default;
+    template <class Facts, std::size_t Count>
+    Record(const Column<Facts> (&columns)[Count], const Facts &facts)
+    {
+        for (const Column<Facts> &column : columns)
+            Add(column.facts.name, column.read(facts));
+    }
+
     void Add(std::string name, Cell value);
 
     std::string Text() const;  // a field a line
@@ -70,6 +64,30 @@ class Record {
   private:
     std::vector<std::pair<std::string, Cell>> fields_;
 };
+
+// What a verb changes: a column of an object.
+struct Change {
+    std::string object;
+    std::string column;
+    Cell before;
+    Cell after;
+};
+
+struct ChangeReport {
+    std::vector<Change> changes;
+    std::vector<std::pair<std::string, Cell>> chosen;  // ids and the like
+    std::string diff;                                  // of the one file that was edited
+    bool dry_run;
+
+    bool Changed() const { return !changes.empty() || !diff.empty(); }
+    std::string Text() const;
+    std::string Json() const;
+};
+
+inline Cell Known(const std::string &text)
+{
+    return Maybe(text);
+}
 
 }  // namespace tavoctl
 

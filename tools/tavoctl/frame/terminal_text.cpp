@@ -71,10 +71,12 @@ std::string Printable(std::string_view text, bool keep_lines)
     return printable;
 }
 
-std::size_t Columns(std::string_view text)
+std::string Joined(const std::vector<std::string> &texts, const char *separator)
 {
-    return static_cast<std::size_t>(
-        std::count_if(text.begin(), text.end(), [](char c) { return (static_cast<unsigned char>(c) & 0xC0) != 0x80; }));
+    std::string joined;
+    for (const std::string &text : texts)
+        joined += (joined.empty() ? "" : separator) + text;
+    return joined;
 }
 
 }  // namespace tavoctl

@@ -2,9 +2,9 @@
 #ifndef TAVOCTL_TERMINAL_TEXT_H
 #define TAVOCTL_TERMINAL_TEXT_H
 
-#include <cstddef>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace tavoctl {
 
@@ -12,8 +12,8 @@ namespace tavoctl {
 // and the invisible characters that turn the direction of text around. Line feeds too, unless keep_lines.
 std::string Printable(std::string_view text, bool keep_lines = false);
 
-// How many columns printable text takes: its characters are counted, and double-width ones as one.
-std::size_t Columns(std::string_view text);
+// The texts with a separator between them.
+std::string Joined(const std::vector<std::string> &texts, const char *separator);
 
 }  // namespace tavoctl
 

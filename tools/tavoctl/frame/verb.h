@@ -1,30 +1,69 @@
 // What a command is: `tavoctl FAMILY VERB`.
+//
+// A verb is a function that declares its arguments and returns what to do with them:
+//
+//     Action ConfGet(Arguments &in)
+//     {
+//         const auto key = in.Text("KEY", setting_key, "the name of the setting");
+//         const auto last = in.Flag("--last", "of a repeated key, the last value");
+//         return [=](Call &call) {
+//             call.Value(setting.value, setting_columns, setting);
+//         };
+//     }
+//
+// and is registered with what it does to the machine, what it answers and its texts:
+//
+//     conf.Add("get", reads, Answer::One(setting_columns), R"(Prints the value of KEY.
+//
+//     tavoctl conf get runsamba)", ConfGet);
+//
+// docs/tavoctl.md has the whole of it.
 #ifndef TAVOCTL_VERB_H
 #define TAVOCTL_VERB_H
 
 #include "frame/arguments.h"
 #include "frame/exit_status.h"
+#include "frame/table.h"
 
+#include <functional>
 #include <string>
+#include <vector>
 
 namespace tavoctl {
 
-class Record;
-class Table;
-
-// What a verb does to the machine; this decides which of the common options it has.
+// What a verb does to the machine; this decides which of the common options it has and who may call it.
 enum Trait : unsigned {
     reads = 0,
-    changes = 1,       // --force-host: refused where the machine is no appliance
-    tells_before = 2,  // --dry-run: shows what it would change
-    destroys = 4,      // --yes: asks first
+    changes = 1,        // root only; --force-host: refused where the machine is not an appliance; --dry-run
+    tells_before = 2,   // --dry-run, for verbs that are classes
+    destroys = 4,       // --yes: asks first
+    by_anybody = 8,     // changes only what its caller may change anyway
+    runs_program = 16,  // its answer is that of a program of the caller's
 };
 
-struct VerbInfo {
-    const char *name;  // "" for a family that is one command
-    unsigned traits;
-    const char *purpose;   // a sentence or more, without a line feed at the end
-    const char *examples;  // a command a line
+// What a verb prints as JSON.
+struct Answer {
+    enum Form { nothing, one, list, change, other } form = other;
+    std::vector<ColumnFacts> columns = {};
+    std::vector<ColumnFacts> or_one = {};  // a list verb that can also show one thing
+
+    template <class Facts_, std::size_t Count>
+    static Answer One(const Column<Facts_> (&columns)[Count])
+    {
+        return {one, Facts(columns), {}};
+    }
+    template <class Facts_, std::size_t Count>
+    static Answer List(const Column<Facts_> (&columns)[Count])
+    {
+        return {list, Facts(columns), {}};
+    }
+    template <class Facts_, std::size_t Count>
+    Answer OrOne(const Column<Facts_> (&columns_of_one)[Count]) const
+    {
+        return {form, columns, Facts(columns_of_one)};
+    }
+    static Answer Change() { return {change, {}, {}}; }
+    static Answer Nothing() { return {nothing, {}, {}}; }
 };
 
 // How the verb was called: the common options, and how it answers.
@@ -33,17 +72,77 @@ struct Call {
     bool dry_run = false;
     bool yes = false;
     bool force_host = false;
+    bool verbose = false;
+    TableStyle style = {};
+
+    int status = exit_done;
+    ChangeReport report = {};
 
     // To standard output: as a table, or as JSON with --json.
-    void Print(const Table &table) const;
-    void Print(const Record &record) const;
+    template <class Facts_, std::size_t Count>
+    void List(const Column<Facts_> (&columns)[Count], const std::vector<Facts_> &records) const
+    {
+        Print(TableOf(columns, records));
+    }
+    template <class Facts_, std::size_t Count>
+    void One(const Column<Facts_> (&columns)[Count], const Facts_ &record) const
+    {
+        Print(Record(columns, record));
+    }
     // One value for scripts: as it is, and printable when it goes to a terminal. The record says the same in JSON.
-    void PrintValue(const std::string &value, const Record &record) const;
+    template <class Facts_, std::size_t Count>
+    void Value(const std::string &value, const Column<Facts_> (&columns)[Count], const Facts_ &record) const
+    {
+        PrintValue(value, Record(columns, record));
+    }
+
+    // What takes long to find out is asked only when it was chosen.
+    template <class Facts_, std::size_t Count>
+    Table TableOf(const Column<Facts_> (&columns)[Count], const std::vector<Facts_> &records) const
+    {
+        Table table(Facts(columns));
+        for (const Facts_ &record : records) {
+            std::vector<Cell> row;
+            for (const Column<Facts_> &column : columns)
+                row.push_back(IsWanted(column.facts) ? column.read(record) : Cell());
+            table.Add(std::move(row));
+        }
+        return table;
+    }
+
+    // The columns in which an object is going to differ; where it is not there yet, or will not be, all that it has.
+    template <class Facts_, std::size_t Count>
+    void Compare(const std::string &object, const Column<Facts_> (&columns)[Count], const std::optional<Facts_> &before,
+                 const std::optional<Facts_> &after)
+    {
+        for (const Column<Facts_> &column : columns)
+            if (column.facts.place != in_one)
+                Change(object, column.facts.name, before ? column.read(*before) : Cell(),
+                       after ? column.read(*after) : Cell());
+    }
+    void Change(const std::string &object, const std::string &column, const Cell &before, const Cell &after);
+    // An id or the like that was chosen; stands in the JSON beside "changed".
+    void Tell(const std::string &name, const Cell &value) { report.chosen.emplace_back(name, value); }
+
+    // Whether there is something to do: not with --dry-run, and not when nothing was going to change. Asks the question
+    // as Confirm does.
+    bool Proceed(const std::string &question = {}) const;
 
     // Asks "QUESTION [y/N]" unless --yes was given; throws a Failure when the answer is no or nobody can be asked.
     void Confirm(const std::string &question) const;
+
+    void Print(const Table &table) const;
+    void Print(const Record &record) const;
+    void PrintValue(const std::string &value, const Record &record) const;
+
+  private:
+    bool IsWanted(const ColumnFacts &column) const;
 };
 
+// Throws a Failure.
+using Action = std::function<void(Call &)>;
+
+// A verb that is a class.
 class Verb {
   public:
     Verb() = default;
@@ -54,6 +153,13 @@ class Verb {
     virtual void Declare(Arguments &) {}
     // Returns the exit status; throws a Failure. It is silent where it has only succeeded.
     virtual int Run(const Call &call) = 0;
+};
+
+struct VerbInfo {
+    const char *name;  // "" for a family that is one command
+    unsigned traits;
+    const char *purpose;   // a sentence or more, without a line feed at the end
+    const char *examples;  // a command a line
 };
 
 }  // namespace tavoctl

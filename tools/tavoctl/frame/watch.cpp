@@ -52,8 +52,10 @@ void Watch(const Call &call, int pause_seconds, const std::function<Table()> &lo
             std::cout << redraw;
         else if (last && !call.json)
             std::cout << "\n";
-        call.Print(table);
-        std::cout << std::flush;
+        if (call.json)
+            std::cout << table.Json(true) << "\n" << std::flush;
+        else
+            std::cout << table.Text(call.style) << std::flush;
         last = std::move(text);
     }
 }
