@@ -6,18 +6,21 @@ add_library(tavo_rules INTERFACE)
 target_compile_definitions(tavo_rules INTERFACE _GNU_SOURCE _FILE_OFFSET_BITS=64 _TIME_BITS=64)
 
 target_compile_options(tavo_rules INTERFACE
-    -Wall -Wextra -Wconversion -Wshadow -Wformat=2 -Werror
-    -fstack-protector-strong -fno-common
-    "$<$<COMPILE_LANG_AND_ID:CXX,GNU>:-fstack-clash-protection>"
+    -Wall -Wextra -Wconversion -Wshadow -Wformat=2 "$<$<BOOL:${TAVO_WERROR}>:-Werror>" -fno-common
     "$<$<COMPILE_LANGUAGE:CXX>:-Wnon-virtual-dtor>"
     "-ffile-prefix-map=${PROJECT_SOURCE_DIR}/=")
-if(CMAKE_SYSTEM_PROCESSOR MATCHES "x86_64|AMD64")
-    target_compile_options(tavo_rules INTERFACE -fcf-protection)
-elseif(CMAKE_SYSTEM_PROCESSOR MATCHES "arm")
+if(CMAKE_SYSTEM_PROCESSOR MATCHES "arm")
     # The note about the parameter passing of GCC 7 says nothing to us: everything is built by one compiler.
     target_compile_options(tavo_rules INTERFACE "$<$<COMPILE_LANG_AND_ID:CXX,GNU>:-Wno-psabi>")
 endif()
-target_link_options(tavo_rules INTERFACE LINKER:-z,relro,-z,now,-z,noexecstack)
+if(TAVO_HARDEN)
+    target_compile_options(tavo_rules INTERFACE -fstack-protector-strong
+        "$<$<COMPILE_LANG_AND_ID:CXX,GNU>:-fstack-clash-protection>")
+    if(CMAKE_SYSTEM_PROCESSOR MATCHES "x86_64|AMD64")
+        target_compile_options(tavo_rules INTERFACE -fcf-protection)
+    endif()
+    target_link_options(tavo_rules INTERFACE LINKER:-z,relro,-z,now,-z,noexecstack)
+endif()
 
 if(TAVO_SANITIZE)
     target_compile_options(tavo_rules INTERFACE -fsanitize=address,undefined -fno-sanitize-recover=undefined
@@ -27,7 +30,7 @@ elseif(TAVO_FUZZ)
     target_compile_options(tavo_rules INTERFACE -fsanitize=fuzzer-no-link,address,undefined -fno-sanitize-recover=all
                                                 -fno-omit-frame-pointer)
     target_link_options(tavo_rules INTERFACE -fsanitize=address,undefined)
-else()
+elseif(TAVO_HARDEN)
     target_compile_options(tavo_rules INTERFACE
         "$<$<NOT:$<OR:$<CONFIG:Debug>,$<BOOL:$<TARGET_PROPERTY:TAVO_QUICK>>>>:-U_FORTIFY_SOURCE;-D_FORTIFY_SOURCE=2>")
 endif()
