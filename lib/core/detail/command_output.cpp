@@ -1,7 +1,7 @@
 // Runs a composed command line through the shell and hands out its standard output line by line.
 #include "core/detail/command_output.h"
 
-#include "core/detail/child_process.h"
+#include "core/detail/open_file.h"
 #include "core/detail/run_command.h"
 
 #include <cstring>
@@ -9,17 +9,6 @@
 #include <fcntl.h>
 
 namespace tavo {
-namespace {
-
-// Out of the way of the child's standard descriptors, for a parent that has closed its own.
-Fd AboveStandard(Fd fd)
-{
-    if (!fd || fd.Get() > 2)
-        return fd;
-    return Fd(::fcntl(fd.Get(), F_DUPFD_CLOEXEC, 3));
-}
-
-}  // namespace
 
 CommandOutput::CommandOutput(const std::string &command)
 {
@@ -30,7 +19,7 @@ CommandOutput::CommandOutput(const std::string &command)
     const Fd write = AboveStandard(Fd(ends[1]));
     read_ = AboveStandard(std::move(low_read));
     if (read_ && write)
-        pid_ = StartCommand(command, write.Get(), kInherited);
+        pid_ = StartCommand(command, write.Get(), words_.Descriptor());
     if (pid_ < 0)
         read_.Reset();
 }

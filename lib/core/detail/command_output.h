@@ -9,6 +9,7 @@
 
 #include "core/detail/child_status.h"
 #include "core/detail/owner.h"
+#include "core/detail/tool_words.h"
 
 #include <optional>
 #include <string>
@@ -17,7 +18,8 @@ namespace tavo {
 
 class CommandOutput {
   public:
-    // Starts the command, in the surroundings that run_command.h describes. Throws bad_alloc.
+    // Starts the command, in the surroundings that run_command.h describes; what it says on its standard error is logged
+    // when this object goes. Throws bad_alloc.
     explicit CommandOutput(const std::string &command);
 
     // Waits for the command's end; one that still writes to its output is ended by SIGPIPE.
@@ -36,6 +38,7 @@ class CommandOutput {
     bool Fill() noexcept;
     int Collect() noexcept;
 
+    ToolWords words_;
     KeepChildStatus keep_;
     Fd read_;
     pid_t pid_ = -1;

@@ -47,6 +47,13 @@ bool IsInPublicDirectory(const char *path)
     return ::stat(parent.c_str(), &st) == 0 && (st.st_mode & S_IWOTH) != 0;
 }
 
+Fd AboveStandard(Fd fd) noexcept
+{
+    if (!fd || fd.Get() > 2)
+        return fd;
+    return Fd(::fcntl(fd.Get(), F_DUPFD_CLOEXEC, 3));
+}
+
 bool WriteAll(int fd, std::string_view text) noexcept
 {
     while (!text.empty()) {

@@ -25,6 +25,10 @@ File OpenToRead(const char *path) noexcept;
 // may be a trap. False when the directory cannot be looked at.
 bool IsInPublicDirectory(const char *path);
 
+// The same file on a descriptor above 2, out of the way of a child's standard descriptors: for a process that has closed its
+// own. Empty with errno on failure.
+Fd AboveStandard(Fd fd) noexcept;
+
 // Writes all of `text`; EINTR and short writes are retried.
 bool WriteAll(int fd, std::string_view text) noexcept;
 

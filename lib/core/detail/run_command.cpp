@@ -24,10 +24,10 @@ std::vector<char *> CommandEnvironment(char *path, char *locale)
     return variables;
 }
 
-int Run(const std::string &command, int output)
+int Run(const std::string &command, int output, int error)
 {
     const KeepChildStatus keep;
-    const pid_t pid = StartCommand(command, output, output);
+    const pid_t pid = StartCommand(command, output, error);
     return pid < 0 ? -1 : CollectChild(pid);
 }
 
@@ -53,12 +53,17 @@ pid_t StartCommand(const std::string &command, int output, int error)
 
 int RunCommand(const std::string &command)
 {
-    return Run(command, kInherited);
+    return Run(command, kInherited, kInherited);
 }
 
 int RunCommandQuietly(const std::string &command)
 {
-    return Run(command, kNullDevice);
+    return Run(command, kNullDevice, kNullDevice);
+}
+
+int RunCommand(const std::string &command, const ToolWords &words)
+{
+    return Run(command, kNullDevice, words.Descriptor());
 }
 
 }  // namespace tavo

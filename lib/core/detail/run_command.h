@@ -5,6 +5,8 @@
 #ifndef TAVO_CORE_DETAIL_RUN_COMMAND_H
 #define TAVO_CORE_DETAIL_RUN_COMMAND_H
 
+#include "core/detail/tool_words.h"
+
 #include <string>
 
 #include <sys/types.h>
@@ -16,6 +18,9 @@ int RunCommand(const std::string &command);
 
 // The same with /dev/null as standard output and error: for commands that complain where that is no failure.
 int RunCommandQuietly(const std::string &command);
+
+// The same with /dev/null as standard output and `words` as standard error.
+int RunCommand(const std::string &command, const ToolWords &words);
 
 // Starts the command; `output` and `error` are descriptors above 2, kNullDevice or kInherited. -1 with errno.
 pid_t StartCommand(const std::string &command, int output, int error);

@@ -11,8 +11,16 @@ namespace tavo {
 
 struct CommandResult {
     std::string command;
-    int status;  // the exit status; -1 when it was not run or was killed
+    int status;            // the exit status; -1 when it was not run or was killed
+    ToolWords words = {};  // logged when the result goes
 };
+
+inline CommandResult RunComposed(const std::string &command)
+{
+    CommandResult result = {command, -1};
+    result.status = RunCommand(command, result.words);
+    return result;
+}
 
 template <class... Args>
 CommandResult RunDiskCommand(FormatFor<Args...> format, const Args &...args)
@@ -20,8 +28,7 @@ CommandResult RunDiskCommand(FormatFor<Args...> format, const Args &...args)
     const std::optional<std::string> command = ShellCommand(format, args...);
     if (!command)
         return {format.Text(), -1};
-    const int status = RunCommand(*command);
-    return {*command, status};
+    return RunComposed(*command);
 }
 
 }  // namespace tavo

@@ -111,7 +111,10 @@ extern "C" int RAIDCreate(const RAIDREQUEST *pRequest)
         // A command that is cut could create some other array.
         const std::string members = MemberArgument(*pRequest);
         const std::string command = Command(*pRequest, *option, members);
-        if (members.size() > kMostCommand || command.size() > kMostCommand || tavo::RunCommand(command) != 0) {
+        tavo::CommandResult result = {command, -1};
+        if (members.size() <= kMostCommand && command.size() <= kMostCommand)
+            result = tavo::RunComposed(command);
+        if (result.status != 0) {
             LogError({"%s:%d Failed to do '%s'", 124}, command);
             return -1;
         }

@@ -2,6 +2,8 @@
 #include "core/detail/run_command.h"
 
 #include "core/detail/command_output.h"
+#include "core/detail/log.h"
+#include "support/captured_log.h"
 #include "support/descriptors.h"
 #include "support/own_child.h"
 #include "support/scratch_dir.h"
@@ -65,6 +67,27 @@ TEST(RunCommand, StatusWhateverTheCallerDoesWithItsChildren)
         EXPECT_EQ(left.sa_handler, action.handler);
         EXPECT_EQ(left.sa_flags & SA_NOCLDWAIT, action.flags);
     }
+}
+
+TEST(ToolWords, GoToTheLogAfterTheLinesOfTheCaller)
+{
+    const test::CapturedLog log;
+    testing::internal::CaptureStderr();
+    testing::internal::CaptureStdout();
+    {
+        CommandOutput output("echo line; echo first >&2; printf 'se\\033cond' >&2; exit 3");
+        std::string line;
+        EXPECT_TRUE(output.Next(line));
+        EXPECT_EQ(output.Status(), 3);
+        const tavo::ToolWords words;
+        EXPECT_EQ(RunCommand("echo lost; echo third >&2", words), 0);
+        tavo::LogError("%s:%d stated");
+    }
+    EXPECT_EQ(testing::internal::GetCapturedStderr() + testing::internal::GetCapturedStdout(), "");
+    std::string text;
+    for (const test::LoggedLine &line : log.Lines())
+        text += std::to_string(line.priority) + line.text.substr(line.text.find(' ')) + "\n";
+    EXPECT_EQ(text, "3 stated\n7 third\n7 first\n7 se\\x1Bcond\n");
 }
 
 // A caller that ignores SIGCHLD never waits: what ended while a command ran must not stay behind as a zombie.
