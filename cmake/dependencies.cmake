@@ -10,4 +10,5 @@ pkg_check_modules(NETTLE REQUIRED IMPORTED_TARGET nettle)
 # The account stores. Debian's package has neither a pkg-config file nor a CMake one.
 find_path(BERKELEY_DB_INCLUDE_DIR db_185.h REQUIRED)
 
-set(TAVO_LIBRARY_DEPENDENCIES PkgConfig::ICU PkgConfig::CRYPT PkgConfig::NETTLE db-5.3)
+# None is linked by the library itself: a small one of its own is, and is loaded when it is first needed.
+set(TAVO_EXTRAS_DEPENDENCIES PkgConfig::ICU PkgConfig::CRYPT PkgConfig::NETTLE db-5.3)

@@ -1,5 +1,5 @@
 # What an installation holds, in components that a packager can take one by one:
-#   runtime      the library, and what keeps /tmp's cleaner away from its lock files
+#   runtime      the library, the small one that it loads itself, and what keeps /tmp's cleaner away from its lock files
 #   development  headers, and what pkg-config and find_package need
 #   tavoctl      the command-line program with its man page and completion
 #   appliance    the discovery daemon and the partitioning tool, which only an appliance runs
@@ -9,6 +9,8 @@ include(CMakePackageConfigHelpers)
 
 install(TARGETS tavosdk EXPORT tavosdkTargets
     LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT runtime NAMELINK_COMPONENT development)
+# The library's own, for nobody to link: it loads what is in there when it is first needed.
+install(TARGETS tavosdk_extras LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/tavosdk COMPONENT runtime)
 # Keeps the cleaner of /tmp away from the lock files.
 install(FILES ${PROJECT_SOURCE_DIR}/cmake/tavosdk-tmpfiles.conf
     DESTINATION lib/tmpfiles.d RENAME tavosdk.conf COMPONENT runtime)

@@ -45,7 +45,7 @@ TAVO_API int TLIBStrDecodeColon(const char *szSrc, char *szDst, int cbDst);
  * result can be longer than the source. szDst may be szSrc; szDst NULL with cbDst 0 asks for the length.
  * Returns the length of the result with its NUL, or -1, with nothing written and
  *   ERR_BAD_PARAMETERS     szSrc is NULL, is not UTF-8 or is longer than 512 MiB, cbDst is negative, or szDst is NULL
- *                          while cbDst is not 0
+ *                          while cbDst is not 0; or szSrc is not ASCII and the library's extras cannot be loaded
  *   ERR_NOT_ENOUGH_MEMORY  szDst is too small
  *   ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBUnicodeUTF8StrUpper(const char *szSrc, char *szDst, int cbDst);
@@ -56,7 +56,8 @@ TAVO_API int TLIBUnicodeUTF8StrCountChar(const char *sz);
 
 /* Compares two UTF-8 texts without regard to case, by the rules of no particular language ("ß" equals "SS").
  * Returns -1, 0 or 1 as szLeft is less than, equal to or greater than szRight. -2 with ERR_BAD_PARAMETERS: an argument
- * is NULL, or one of them is not UTF-8, wherever in the text. */
+ * is NULL, or one of them is not UTF-8, wherever in the text; or one is not ASCII and the library's extras cannot be
+ * loaded. */
 TAVO_API int TLIBUnicodeUTF8StrCaseCmp(const char *szLeft, const char *szRight);
 
 TAVO_END_DECLS

@@ -215,7 +215,8 @@ TAVO_API int TAVOUserExpiredDateGet(const TAVOUSER *pUser, char *szBuf, int cbBu
 TAVO_API int BlTLIBIsUserName(const char *szName);
 
 /* The LAN Manager hash: the password in code page 850, upper-case, its first 14 bytes. rgHash holds 16 bytes.
- * Returns 0, or -1 with ERR_BAD_PARAMETERS for a NULL argument. */
+ * Returns 0, or -1 with ERR_BAD_PARAMETERS for a NULL argument, ERR_OP_FAILURE when the password cannot be converted or
+ * the library's extras cannot be loaded, ERR_OUT_OF_MEMORY; then rgHash is as it was. */
 TAVO_API int TLIBSmbLmHash(const char *szPasswd, unsigned char *rgHash);
 
 /* The NT hash: MD4 of the password in UTF-16, low byte first. As TLIBSmbLmHash. */

@@ -2,6 +2,7 @@
 #include "tavo_appliance.h"
 
 #include "appliance/detail/smb_user_lists.h"
+#include "core/detail/extras.h"
 #include "core/detail/file_rewrite.h"
 #include "core/detail/guard.h"
 #include "core/detail/keep_fault.h"
@@ -29,6 +30,8 @@ extern "C" int TAVOUserModifySmbConf(const TLIBSZHASH *pshNames)
     if (!pshNames)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
+        if (!tavo::LoadExtras())  // a name that could not be compared would stay as it is
+            return Fail(ERR_OPEN_FAILED);
         tavo::FileRewrite file;
         const int open_code = file.Open(kSmbConf);
         if (file.IsMissing())

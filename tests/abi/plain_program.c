@@ -17,6 +17,7 @@ static void check(int holds, const char *what)
 int main(void)
 {
     int named = 0, i;
+    char upper[16];
     TLIBSZLIST *list = PslTLIBSzListAlloc(0);
 
     for (i = 0; i < errNum; i++)
@@ -38,5 +39,7 @@ int main(void)
 
     check(TLIBSzListPush(&list, "one") == 0 && strcmp(SzTLIBSzListGet(list, 0), "one") == 0, "a list works");
     TLIBSzListFree(list);
+    check(TLIBUnicodeUTF8StrUpper("gr\xC3\xBCn", upper, sizeof upper) == 6 && strcmp(upper, "GR\xC3\x9CN") == 0,
+          "what is loaded when it is needed is found");
     return failures != 0;
 }

@@ -4,6 +4,7 @@
 #include "tavo_lock.h"
 
 #include "account/detail/store_seal.h"
+#include "core/detail/extras.h"
 #include "core/detail/keep_fault.h"
 #include "core/detail/owner.h"
 
@@ -33,6 +34,8 @@ int AccountSession::OpenToRead(std::span<const size_t> stores)
 {
     if (!is_root_)
         return text_stores_.Open(stores);
+    if (!LoadExtras())
+        return ERR_OPEN_FAILED;
     if (const int code = Lock(kind_.lock, TAVO_LOCK_SHARED))
         return code;
     if (SealHolds(kind_.family) && Open(stores) == 0 && IsCurrent())
@@ -50,6 +53,8 @@ int AccountSession::OpenToChange(unsigned locks)
 {
     if (!is_root_)
         return ERR_ACCESS_DENIED;
+    if (!LoadExtras())
+        return ERR_OPEN_FAILED;
     if (const int code = Lock(locks, TAVO_LOCK_EXCLUSIVE))
         return code;
     std::vector<size_t> all(kind_.family.stores.size());

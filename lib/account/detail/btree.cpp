@@ -5,6 +5,7 @@
 #include "account/detail/free_name.h"
 #include "account/detail/store_seal.h"
 #include "account/detail/store_sync.h"
+#include "core/detail/extras.h"
 #include "core/detail/owner.h"
 
 #include <cstring>
@@ -110,6 +111,9 @@ bool IsSameFile(const DB *db, const StoreFile &file)
 
 int Btree::Open(const char *path, const Options &options, std::unique_ptr<Btree> &out)
 {
+    const Extras *extras = LoadExtras();
+    if (!extras)
+        return ERR_OPEN_FAILED;
     const bool may_create = (options.flags & O_CREAT) != 0;
     const mode_t mode_of_ours = ModeOfStore(path);
     const StoreAccess access{mode_of_ours != 0 ? mode_of_ours : options.mode, mode_of_ours != 0};
@@ -137,9 +141,8 @@ int Btree::Open(const char *path, const Options &options, std::unique_ptr<Btree>
         break;
     }
     std::unique_ptr<Btree> store(new Btree(path, (options.flags & O_ACCMODE) == O_RDONLY));
-    BTREEINFO parameters = {};
     errno = 0;
-    store->pDb = ::dbopen(path, options.flags & O_ACCMODE, 0, DB_BTREE, options.info ? &parameters : nullptr);
+    store->pDb = extras->open_btree(path, options.flags & O_ACCMODE, 0, options.info);
     if (!store->pDb)
         return errno == EINVAL ? RemoveForeign(path, access.is_ours) : OpenCode(errno);
     if (!IsSameFile(Handle(store.get()), file))
@@ -150,11 +153,13 @@ int Btree::Open(const char *path, const Options &options, std::unique_ptr<Btree>
 
 int Btree::Create(const char *path, std::unique_ptr<Btree> &out)
 {
+    const Extras *extras = LoadExtras();
+    if (!extras)
+        return ERR_OPEN_FAILED;
     const NoStoreSync no_sync;
     std::unique_ptr<Btree> store(new Btree(path, false));
-    BTREEINFO parameters = {};
     errno = 0;
-    store->pDb = ::dbopen(path, O_RDWR | O_CREAT, 0600, DB_BTREE, &parameters);
+    store->pDb = extras->open_btree(path, O_RDWR | O_CREAT, 0600, true);
     if (!store->pDb)
         return OpenCode(errno);
     out = std::move(store);

@@ -2,6 +2,7 @@
 #include "account/detail/btree_file.h"
 
 #include "account/detail/store_sync.h"
+#include "core/detail/extras.h"
 #include "core/detail/open_file.h"
 
 #include <bit>
@@ -101,9 +102,11 @@ bool CreateBtreeFile(const char *path, bool info, mode_t mode)
     const BuildDir dir(path);
     if (!dir)
         return false;
+    const Extras *extras = LoadExtras();
+    if (!extras)
+        return false;
     const NoStoreSync no_sync;
-    BTREEINFO parameters = {};
-    DB *db = ::dbopen(dir.File(), O_RDWR | O_CREAT, 0600, DB_BTREE, info ? &parameters : nullptr);
+    DB *db = static_cast<DB *>(extras->open_btree(dir.File(), O_RDWR | O_CREAT, 0600, info));
     if (!db)
         return false;
     const Fd fd = OpenFd(dir.File(), O_RDONLY | O_NOFOLLOW);

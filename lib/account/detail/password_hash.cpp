@@ -2,14 +2,12 @@
 #include "account/detail/password_hash.h"
 
 #include "account/detail/salt_char.h"
+#include "account/detail/secret_text.h"
 #include "account/detail/setting_switch.h"
+#include "core/detail/extras.h"
 
 #include <cerrno>
-#include <memory>
 #include <new>
-
-#include <crypt.h>
-#include <string.h>
 
 namespace tavo {
 namespace {
@@ -24,20 +22,11 @@ std::string FreshSetting(time_t now)
     return setting;
 }
 
-struct WipeScratch {
-    void operator()(crypt_data *scratch) const noexcept
-    {
-        ::explicit_bzero(scratch, sizeof *scratch);
-        delete scratch;
-    }
-};
-
-std::string Crypt(const char *clear, const std::string &setting)
+std::string Crypt(const Extras &extras, const char *clear, const std::string &setting)
 {
-    const std::unique_ptr<crypt_data, WipeScratch> scratch(new crypt_data);  // 32 KiB, of which this field is read
-    scratch->initialized = 0;
+    SecretBytes room(kCryptRoom);
     errno = 0;
-    const char *hash = ::crypt_r(clear, setting.c_str(), scratch.get());
+    const char *hash = extras.crypt(clear, setting.c_str(), room.data());
     if (hash && *hash != '*')
         return hash;
     if (errno == ENOMEM)
@@ -46,11 +35,10 @@ std::string Crypt(const char *clear, const std::string &setting)
 }
 
 // Empty when the system has no random bytes or does not know the method.
-std::string RandomSetting(HashMethod method)
+std::string RandomSetting(const Extras &extras, HashMethod method)
 {
-    char setting[CRYPT_GENSALT_OUTPUT_SIZE];
-    const char *prefix = method == HashMethod::kSha512 ? "$6$" : "$y$";
-    const char *made = ::crypt_gensalt_rn(prefix, 0, nullptr, 0, setting, sizeof setting);
+    char setting[kSaltRoom];
+    const char *made = extras.salt(method == HashMethod::kSha512 ? "$6$" : "$y$", setting);
     return made && *made != '*' ? made : "";
 }
 
@@ -73,12 +61,15 @@ HashMethod ConfiguredHashMethod()
 
 std::string HashPassword(const char *clear, std::string_view previous, time_t now, HashMethod method)
 {
+    const Extras *extras = LoadExtras();
+    if (!extras)
+        return {};
     if (method != HashMethod::kMd5) {
-        const std::string setting = RandomSetting(method);
-        return setting.empty() ? setting : Crypt(clear, setting);
+        const std::string setting = RandomSetting(*extras, method);
+        return setting.empty() ? setting : Crypt(*extras, clear, setting);
     }
-    std::string hash = Crypt(clear, HashSetting(previous, now));
-    return hash.empty() ? Crypt(clear, FreshSetting(now)) : hash;
+    std::string hash = Crypt(*extras, clear, HashSetting(previous, now));
+    return hash.empty() ? Crypt(*extras, clear, FreshSetting(now)) : hash;
 }
 
 }  // namespace tavo

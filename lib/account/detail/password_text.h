@@ -9,7 +9,7 @@
 namespace tavo {
 
 // Upper-case, character by character: "ß" stays one. A password that cannot be converted is never taken for an empty one:
-// 0, or ERR_OP_FAILURE when ICU cannot convert. Throws bad_alloc.
+// 0, or ERR_OP_FAILURE when ICU cannot convert or cannot be loaded. Throws bad_alloc.
 int UpperCodePage850(std::string_view utf8, SecretBytes &bytes);
 
 // UTF-16, the low byte of each unit first. The same codes.

@@ -13,6 +13,9 @@ class NoStoreSync {
     ~NoStoreSync();
     NoStoreSync(const NoStoreSync &) = delete;
     NoStoreSync &operator=(const NoStoreSync &) = delete;
+
+  private:
+    bool outermost_;
 };
 
 }  // namespace tavo

@@ -11,7 +11,8 @@ namespace {
 constexpr char kPasswordLock[] = "/etc/.pwd.lock";
 constexpr int kTriesEachSecond = 20;
 
-constinit Fd lock_file;
+// A number, not an owner: a destructor at the exit of the program would have to be registered when the library is loaded.
+constinit int lock_file = -1;
 constinit int holders = 0;
 
 Fd TryFor(int seconds) noexcept
@@ -40,8 +41,8 @@ bool SystemLock::Take(int seconds) noexcept
     if (held_)
         return true;
     if (holders == 0)
-        lock_file = TryFor(seconds);
-    held_ = static_cast<bool>(lock_file);
+        lock_file = TryFor(seconds).Release();
+    held_ = lock_file >= 0;
     holders += held_ ? 1 : 0;
     return held_;
 }
@@ -49,7 +50,7 @@ bool SystemLock::Take(int seconds) noexcept
 void SystemLock::Release() noexcept
 {
     if (std::exchange(held_, false) && --holders == 0)
-        lock_file.Reset();
+        Fd(std::exchange(lock_file, -1)).Reset();
 }
 
 }  // namespace tavo

@@ -1,12 +1,11 @@
 // UTF-8 text without regard to case.
 #include "core/detail/folded_text.h"
 
+#include "core/detail/extras.h"
+
 #include <climits>
 #include <cstring>
 
-#include <unicode/uchar.h>
-#include <unicode/ustring.h>
-#include <unicode/utf16.h>
 #include <unicode/utf8.h>
 
 namespace tavo {
@@ -17,18 +16,18 @@ constexpr bool IsAscii(char byte)
     return static_cast<unsigned char>(byte) < 0x80;
 }
 
-constexpr UChar32 FoldAscii(char byte)
+constexpr int32_t FoldAscii(char byte)
 {
     return byte >= 'A' && byte <= 'Z' ? byte + ('a' - 'A') : byte;
 }
 
-// ICU's macro narrows where it has masked.
+// ICU's macro needs nothing of its library, and narrows where it has masked.
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Wconversion"
 // The code point at `at`, which moves behind it; negative when the bytes are not UTF-8.
-UChar32 NextCodePoint(const char *&at)
+int32_t NextCodePoint(const char *&at)
 {
-    UChar32 code_point;
+    int32_t code_point;
     int32_t length = 0;
     U8_NEXT(at, length, -1, code_point);
     at += length;
@@ -42,16 +41,13 @@ class FoldedCursor {
     explicit FoldedCursor(const char *text) : at_(text) {}
 
     // The next code point, 0 at the end, negative where the text is not UTF-8.
-    UChar32 Next()
+    int32_t Next()
     {
-        if (pending_ < pending_end_) {
-            UChar32 code_point;
-            U16_NEXT_UNSAFE(folded_, pending_, code_point);
-            return code_point;
-        }
+        if (pending_ < pending_end_)
+            return folded_[pending_++];
         if (IsAscii(*at_))
             return *at_ ? FoldAscii(*at_++) : 0;
-        const UChar32 code_point = NextCodePoint(at_);
+        const int32_t code_point = NextCodePoint(at_);
         return code_point < 0 ? code_point : Fold(code_point);
     }
 
@@ -67,27 +63,19 @@ class FoldedCursor {
     }
 
   private:
-    // Few characters fold to more than one; those go through the buffer.
-    UChar32 Fold(UChar32 code_point)
+    // Few characters fold to more than one; those wait in the buffer.
+    int32_t Fold(int32_t code_point)
     {
-        UChar source[2];
-        int32_t length = 0;
-        U16_APPEND_UNSAFE(source, length, code_point);
-        UErrorCode error = U_ZERO_ERROR;
-        const int32_t folded = u_strFoldCase(folded_, kFoldedMost, source, length, U_FOLD_CASE_DEFAULT, &error);
-        if (U_FAILURE(error) || folded < 1)
-            return u_foldCase(code_point, U_FOLD_CASE_DEFAULT);
-        pending_ = 0;
-        pending_end_ = folded;
-        UChar32 first;
-        U16_NEXT_UNSAFE(folded_, pending_, first);
-        return first;
+        const Extras *extras = LoadExtras();
+        if (!extras)
+            return -1;
+        pending_end_ = extras->fold(code_point, folded_, kMostFolded);
+        pending_ = 1;
+        return folded_[0];
     }
 
-    static constexpr int32_t kFoldedMost = 32;
-
     const char *at_;
-    UChar folded_[kFoldedMost];
+    int32_t folded_[kMostFolded];
     int32_t pending_ = 0;
     int32_t pending_end_ = 0;
 };
@@ -102,8 +90,8 @@ int CompareFolded(const char *left, const char *right) noexcept
     }
     FoldedCursor left_cursor(left);
     FoldedCursor right_cursor(right);
-    UChar32 left_char;
-    UChar32 right_char;
+    int32_t left_char;
+    int32_t right_char;
     do {
         left_char = left_cursor.Next();
         right_char = right_cursor.Next();
@@ -123,6 +111,13 @@ int OrderFolded(const char *left, const char *right) noexcept
     if (left_is_text != right_is_text)
         return left_is_text ? -1 : 1;
     return std::strcmp(left, right);
+}
+
+bool CanFold(const char *text) noexcept
+{
+    while (*text && IsAscii(*text))
+        ++text;
+    return !*text || LoadExtras();
 }
 
 int CountCodePoints(const char *text) noexcept

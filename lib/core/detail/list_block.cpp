@@ -1,6 +1,9 @@
 // The block of a string list: how it is made, how it grows.
 #include "core/detail/list_block.h"
 
+#include "core/detail/folded_text.h"
+
+#include <algorithm>
 #include <climits>
 #include <cstdlib>
 #include <cstring>
@@ -86,6 +89,17 @@ void AppendItem(TLIBSZLIST *list, const char *string) noexcept
 {
     list->pszItem[list->nItem++] = StoreString(list, string, std::strlen(string));
     list->nFree -= kListSlot;
+}
+
+bool CanPlace(const TLIBSZLIST *list, const char *string) noexcept
+{
+    return list->fMode != TLIB_SZLIST_CASESORTED || CanFold(string);
+}
+
+bool CanOrder(const TLIBSZLIST *list, int mode) noexcept
+{
+    const bool folds = !(mode & TLIB_SZLIST_SORTED) && (mode & TLIB_SZLIST_CASESORTED);
+    return !folds || std::all_of(list->pszItem, list->pszItem + list->nItem, CanFold);
 }
 
 void SortItems(TLIBSZLIST *list, int mode) noexcept

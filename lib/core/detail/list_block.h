@@ -67,6 +67,11 @@ char *StoreString(TLIBSZLIST *list, const char *string, size_t length) noexcept;
 // Adds the string as the last item, whatever the mode; there must be room.
 void AppendItem(TLIBSZLIST *list, const char *string) noexcept;
 
+// True unless what is needed to compare `string` with items, or the items with each other as `mode` says, cannot be
+// loaded. To be asked before the list is changed.
+bool CanPlace(const TLIBSZLIST *list, const char *string) noexcept;
+bool CanOrder(const TLIBSZLIST *list, int mode) noexcept;
+
 // Sorts the items as they stand by the order of the mode.
 void SortItems(TLIBSZLIST *list, int mode) noexcept;
 

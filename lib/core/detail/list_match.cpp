@@ -35,7 +35,8 @@ TLIBSZLIST *SelectIntoNewList(const TLIBSZLIST *a, const TLIBSZLIST *b, bool fou
 
 bool CanMatch(const TLIBSZLIST *a, const TLIBSZLIST *b) noexcept
 {
-    return !IsSorted(a) || !IsSorted(b) || a->fMode == b->fMode;
+    const int modes = a->fMode | b->fMode;
+    return (!IsSorted(a) || !IsSorted(b) || a->fMode == b->fMode) && CanOrder(a, modes) && CanOrder(b, modes);
 }
 
 bool Matcher::Has(const char *item) noexcept

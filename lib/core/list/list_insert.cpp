@@ -24,6 +24,8 @@ extern "C" int TLIBSzListInsert(TLIBSZLIST **ppList, int i, const char *sz)
 {
     if (!ppList || !*ppList || !sz || i < 0)
         return Fail(ERR_BAD_PARAMETERS, Line{45});
+    if (!tavo::CanPlace(*ppList, sz))
+        return Fail(ERR_BAD_PARAMETERS);
     const size_t length = std::strlen(sz);
     if (tavo::IsSorted(*ppList))
         i = PlaceInOrder(*ppList, sz);

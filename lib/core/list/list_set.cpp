@@ -10,6 +10,8 @@ extern "C" int TLIBSzListSet(TLIBSZLIST **ppList, int i, const char *sz)
 {
     if (!ppList || !tavo::HasItem(*ppList, i) || !sz)
         return Fail(ERR_BAD_PARAMETERS);
+    if (tavo::IsSorted(*ppList) && !(tavo::CanOrder(*ppList, (*ppList)->fMode) && tavo::CanPlace(*ppList, sz)))
+        return Fail(ERR_BAD_PARAMETERS);
     const size_t length = std::strlen(sz);
     // In place it goes over the old text. A hole has no text, so only "" ever lands on the empty string that all
     // holes share.

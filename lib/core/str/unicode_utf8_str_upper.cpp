@@ -1,62 +1,68 @@
 // Copies a UTF-8 text in upper case.
 #include "tavo_str.h"
 
+#include "core/detail/extras.h"
 #include "core/detail/guard.h"
 
+#include <algorithm>
 #include <climits>
 #include <cstring>
+#include <optional>
 #include <string>
-
-#include <unicode/ustring.h>
+#include <string_view>
 
 namespace {
 
-// Account names are keyed by this: a language of the process must not change where a name is found.
-constexpr const char *kNoLanguage = "";
-
-// ICU answers by code; what does not fit is told by the length, so only these are failures here.
-bool Converted(UErrorCode error)
+bool IsAscii(std::string_view text)
 {
-    return U_SUCCESS(error) || error == U_BUFFER_OVERFLOW_ERROR;
+    return std::all_of(text.begin(), text.end(), [](char byte) { return static_cast<unsigned char>(byte) < 0x80; });
 }
 
-// Empty when the text is not UTF-8 (or is too long for ICU); empty text does not come here.
-std::u16string ToUtf16(const char *text, int32_t length)
+std::string UpperAscii(std::string_view text)
 {
-    std::u16string utf16(static_cast<size_t>(length), u'\0');  // never longer than the UTF-8 text
-    int32_t units = 0;
-    UErrorCode error = U_ZERO_ERROR;
-    u_strFromUTF8(utf16.data(), length, &units, text, length, &error);
-    utf16.resize(U_SUCCESS(error) ? static_cast<size_t>(units) : 0);
-    return utf16;
+    std::string upper(text);
+    for (char &byte : upper)
+        byte = byte >= 'a' && byte <= 'z' ? static_cast<char>(byte - 'a' + 'A') : byte;
+    return upper;
 }
 
-std::u16string Upper(const std::u16string &text)
+// What `convert` makes of a text, in as many units as it takes; nothing when it makes nothing of it.
+template <class Text, class Convert>
+std::optional<Text> Converted(size_t likely, Convert convert)
 {
-    std::u16string upper(text.size() + 16, u'\0');
+    Text converted(likely, 0);
     for (;;) {
-        UErrorCode error = U_ZERO_ERROR;
-        const int32_t units = u_strToUpper(upper.data(), static_cast<int32_t>(upper.size()), text.data(),
-                                           static_cast<int32_t>(text.size()), kNoLanguage, &error);
-        const bool fits = static_cast<size_t>(units) <= upper.size();
-        upper.resize(Converted(error) ? static_cast<size_t>(units) : 0);
+        const int32_t length = convert(converted.data(), static_cast<int32_t>(converted.size()));
+        if (length < 0 || length == INT_MAX)
+            return std::nullopt;
+        const bool fits = static_cast<size_t>(length) <= converted.size();
+        converted.resize(static_cast<size_t>(length));
         if (fits)
-            return upper;
+            return converted;
     }
 }
 
-int CopyAsUtf8(const std::u16string &text, char *buffer, int size)
+// Nothing when the text is not UTF-8, or the tables cannot be loaded.
+std::optional<std::string> Upper(std::string_view text)
 {
-    int32_t length = 0;
-    UErrorCode error = U_ZERO_ERROR;
-    u_strToUTF8(nullptr, 0, &length, text.data(), static_cast<int32_t>(text.size()), &error);
-    if (!Converted(error) || length == INT_MAX || (buffer && length >= size))
-        return Fail(ERR_NOT_ENOUGH_MEMORY);
-    if (buffer) {
-        error = U_ZERO_ERROR;
-        u_strToUTF8(buffer, size, nullptr, text.data(), static_cast<int32_t>(text.size()), &error);
-    }
-    return length + 1;
+    if (IsAscii(text))
+        return UpperAscii(text);
+    const tavo::Extras *extras = tavo::LoadExtras();
+    if (!extras)
+        return std::nullopt;
+    const auto utf16 = Converted<std::u16string>(text.size(), [&](char16_t *out, int32_t room) {
+        return extras->to_utf16(text.data(), static_cast<int32_t>(text.size()), tavo::kNoSubstitute, out, room);
+    });
+    if (!utf16)
+        return std::nullopt;
+    const auto upper = Converted<std::u16string>(utf16->size() + 16, [&](char16_t *out, int32_t room) {
+        return extras->upper(utf16->data(), static_cast<int32_t>(utf16->size()), out, room);
+    });
+    if (!upper)
+        return std::nullopt;
+    return Converted<std::string>(3 * upper->size(), [&](char *out, int32_t room) {
+        return extras->to_utf8(upper->data(), static_cast<int32_t>(upper->size()), out, room);
+    });
 }
 
 }  // namespace
@@ -69,9 +75,13 @@ extern "C" int TLIBUnicodeUTF8StrUpper(const char *szSrc, char *szDst, int cbDst
     if (length > INT_MAX / 4)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        const std::u16string text = ToUtf16(szSrc, static_cast<int32_t>(length));
-        if (text.empty() && length > 0)
+        const std::optional<std::string> upper = Upper({szSrc, length});
+        if (!upper)
             return Fail(ERR_BAD_PARAMETERS);
-        return CopyAsUtf8(Upper(text), szDst, cbDst);
+        if (szDst && upper->size() >= static_cast<size_t>(cbDst))
+            return Fail(ERR_NOT_ENOUGH_MEMORY);
+        if (szDst)
+            std::memcpy(szDst, upper->c_str(), upper->size() + 1);
+        return static_cast<int>(upper->size()) + 1;
     });
 }

@@ -1,0 +1,5 @@
+/* A program that links the C library alone. */
+int main(void)
+{
+    return 0;
+}
