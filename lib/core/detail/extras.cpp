@@ -21,7 +21,7 @@ constinit std::atomic<const Extras *> loaded_extras = nullptr;
 constinit std::atomic<bool> told_of_extras = false;
 
 // The small library in the folder beside the object that holds this code. A program and a library with a relative name
-// know their folder by "$ORIGIN" alone: whoever loaded_extras them may have changed directory since.
+// know their folder by "$ORIGIN" alone: the working directory may be another one by now.
 bool FileBeside(char (&path)[PATH_MAX]) noexcept
 {
     Dl_info info;
