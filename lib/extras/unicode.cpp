@@ -1,4 +1,5 @@
 // Unicode, from ICU.
+#include "core/detail/extras.h"
 #include "extras/parts.h"
 
 #include <unicode/uchar.h>
@@ -15,7 +16,9 @@ constexpr const char *kNoLanguage = "";
 // ICU answers by code; what does not fit is told by the length.
 int32_t Length(UErrorCode error, int32_t length)
 {
-    return U_SUCCESS(error) || error == U_BUFFER_OVERFLOW_ERROR ? length : -1;
+    if (U_SUCCESS(error) || error == U_BUFFER_OVERFLOW_ERROR)
+        return length;
+    return error == U_MEMORY_ALLOCATION_ERROR ? kNoMemory : kNoResult;
 }
 
 }  // namespace
@@ -71,7 +74,7 @@ int32_t ToCodePage850(const char16_t *text, int32_t length, char *out, int32_t r
     UErrorCode error = U_ZERO_ERROR;
     UConverter *code_page = ucnv_open("ibm-850", &error);
     if (U_FAILURE(error))
-        return -1;
+        return Length(error, 0);
     const int32_t bytes = ucnv_fromUChars(code_page, out, room, text, length, &error);
     ucnv_close(code_page);
     return Length(error, bytes);

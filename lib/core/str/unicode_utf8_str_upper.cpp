@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <climits>
 #include <cstring>
+#include <new>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -33,6 +34,8 @@ std::optional<Text> Converted(size_t likely, Convert convert)
     Text converted(likely, 0);
     for (;;) {
         const int32_t length = convert(converted.data(), static_cast<int32_t>(converted.size()));
+        if (length == tavo::kNoMemory)
+            throw std::bad_alloc();
         if (length < 0 || length == INT_MAX)
             return std::nullopt;
         const bool fits = static_cast<size_t>(length) <= converted.size();

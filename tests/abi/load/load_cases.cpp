@@ -142,6 +142,7 @@ void RefusesAll(void *library, const test::ScratchDir &folder, const char *why)
 
     unsigned char hash[16] = "unchanged";
     EXPECT_EQ(FIND(library, TLIBSmbMd4Hash)("secret", hash), -1);
+    EXPECT_EQ(Code(library), ERR_OP_FAILURE);
     EXPECT_EQ(FIND(library, TLIBSmbLmHash)("secret", hash), -1);
     EXPECT_STREQ(reinterpret_cast<char *>(hash), "unchanged");
     const std::string store = folder / "store";
