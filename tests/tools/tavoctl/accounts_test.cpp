@@ -170,7 +170,7 @@ TEST_F(TavoctlAccounts, ReadingVerbsSayTheSameAsTheFiles)
                  {"privilege", "0x23"},
                  {"password", "set"},
                  {"cannot_change_password", false},
-                 {"expires", "2037/01/31"},
+                 {"expires", "2037-01-31"},
                  {"expired", false},
                  {"groups", {"users"}}};
     EXPECT_EQ(Shown({"user", "show", "Anna"}), anna);
@@ -187,7 +187,7 @@ TEST_F(TavoctlAccounts, ReadingVerbsSayTheSameAsTheFiles)
     EXPECT_THAT(names(Shown({"user", "list", "--prefix", "A"})), ElementsAre("admin", "anna"));
     EXPECT_THAT(names(Shown({"user", "list", "--part", "ERT"})), ElementsAre("berta"));
     const json guest = Shown({"user", "list", "--prefix", "guest"}).at(0);
-    EXPECT_EQ(guest.at("expires"), "1970/01/02");
+    EXPECT_EQ(guest.at("expires"), "1970-01-02");
     EXPECT_EQ(guest.at("expired"), true);
     EXPECT_EQ(Tavoctl({"--complete", "user", "show", "an"}).out, "anna\n");
 }
@@ -363,12 +363,12 @@ TEST_F(TavoctlAccounts, AListThatIsWrongAnywhereIsRefusedWhole)
         const char *reason;
     } cases[] = {
         {{"user"}, "name,password\nx,1\nanna,1\n", "row 3, anna: ERR_USER_EXISTS"},
-        {{"user"}, "name,password\nx,1\nX,1\n", "twice"},
+        {{"user"}, "name,password\nx,1\nX,1\n", "duplicate name"},
         {{"user"}, "name,password\nx,1\n", nullptr},
         {{"user"}, "name,password\nx,1\ny,\n", "row 3, y: it has no password"},
         {{"user"}, "name,password\nx,1\ny\n", "row 3 has 1 fields"},
         {{"user"}, "name,colour\nx,red\n", "colour"},
-        {{"user"}, "name,name\nx,y\n", "twice"},
+        {{"user"}, "name,name\nx,y\n", "duplicate column"},
         {{"user"}, "password\n1\n", "no name"},
         {{"user"}, "name,password\nx,\"1\n", "not closed"},
         {{"user"}, "name,password\nx,1\na:b,1\n", "ERR_INVALID_USERNAME"},
@@ -376,12 +376,12 @@ TEST_F(TavoctlAccounts, AListThatIsWrongAnywhereIsRefusedWhole)
         {{"user"}, "name,password,uid\nx,1,1500\ny,1,1500\n", "1500"},
         {{"user"}, "name,password,expires\nx,1,2026/13/01\n", "2026/13/01"},
         {{"user"}, "name,password_hash\nx,$1$ab$c\n", "some are missing"},
-        {{"user"}, "[{\"name\":\"x\",\"password\":\"1\"},3]", "row 2 is no object"},
+        {{"user"}, "[{\"name\":\"x\",\"password\":\"1\"},3]", "row 2 is not an object"},
         {{"user"}, "[{\"name\":\"x\",\"password\":{}}]", "fits no field"},
         {{"user"}, "{\"name\":\"x\"}", "neither a JSON array"},
         {{"user"}, "[{\"name\":\"x\",\"password\":\"1\"}", "neither a JSON array"},
         {{"group"}, "name,members\nnew,anna\nodd,\"anna,nemo\"\n", "nemo"},
-        {{"group"}, "name,gid\nnew,70000\nodd,70000\n", "twice"},
+        {{"group"}, "name,gid\nnew,70000\nodd,70000\n", "duplicate group id 70000"},
     };
     for (const auto &[verb, list, reason] : cases) {
         const std::vector<std::string> before = AccountFiles();
@@ -395,6 +395,65 @@ TEST_F(TavoctlAccounts, AListThatIsWrongAnywhereIsRefusedWhole)
         EXPECT_EQ(AccountFiles(), before) << list;
     }
     EXPECT_EQ(Tavoctl({"user", "import", "/none"}).status, 3);
+
+    // What is not a list of accounts is not read to its end.
+    const ScratchDir dir;
+    ASSERT_EQ(::mkfifo((dir / "fifo").c_str(), 0600), 0);
+    WriteFile(dir / "large", "name\n");
+    ASSERT_EQ(::truncate((dir / "large").c_str(), off_t{1} << 30), 0);
+    const struct {
+        std::string path;
+        const char *reason;
+    } inputs[] = {{"/dev/zero", "not a regular file"}, {dir / "fifo", "not a regular file"}, {dir / "large", "16 MiB"}};
+    for (const auto &[path, reason] : inputs)
+        for (const char *family : {"user", "group"}) {
+            const test::Ran ran = Tavoctl({family, "import", path});
+            EXPECT_EQ(ran.status, 2) << path;
+            EXPECT_THAT(ran.err, HasSubstr(reason)) << path;
+        }
+    EXPECT_EQ(test::ShellStatus(std::system("tavoctl user import - </dev/zero 2>/dev/null")), 2);
+    EXPECT_EQ(test::ShellStatus(std::system("tr '\\0' x </dev/zero | tavoctl user import - 2>/dev/null")), 2);
+}
+
+TEST_F(TavoctlAccounts, ChangesAreShownBeforeAndSaidAfter)
+{
+    const auto run = [](Words words) {
+        words.emplace_back("--json");
+        return test::Facts(words);
+    };
+    const auto change = [](const char *object, const char *column, const json &before, const json &after) {
+        return json{{"object", object}, {"column", column}, {"old", before}, {"new", after}};
+    };
+    const std::vector<std::string> before = AccountFiles();
+    const json mail = change("user anna", "mail", "anna@example.com", "a@example.com");
+    const json planned = run({"user", "modify", "anna", "--dry-run", "--mail", "a@example.com"});
+    EXPECT_EQ(planned, (json{{"changed", true}, {"dry_run", true}, {"changes", {mail}}}));
+    EXPECT_EQ(Tavoctl({"group", "add", "--dry-run", "staff", "--members", "anna"}).out,
+              "OBJECT       COLUMN   OLD  NEW\n"
+              "group staff  name     -    staff\n"
+              "group staff  kind     -    local\n"
+              "group staff  members  -    anna\n");
+    EXPECT_EQ(run({"user", "delete", "--dry-run", "anna"}).at("changed"), true);
+    EXPECT_EQ(AccountFiles(), before);
+
+    struct stat old_state = {};
+    ::stat(passwd, &old_state);
+    for (const Words &words :
+         std::vector<Words>{{"user", "modify", "anna", "--mail", "anna@example.com", "--privilege", "35"},
+                            {"user", "expire", "anna", "2037/01/31"},
+                            {"user", "rename", "anna", "anna"}})
+        EXPECT_EQ(run(words), (json{{"changed", false}, {"changes", json::array()}})) << testing::PrintToString(words);
+    struct stat state = {};
+    ::stat(passwd, &state);
+    EXPECT_EQ(state.st_ino, old_state.st_ino) << "nothing was written";
+    EXPECT_EQ(AccountFiles(), before);
+
+    EXPECT_EQ(run({"user", "modify", "anna", "--mail", "a@example.com"}).at("changes"), json{mail});
+    const json added = run({"user", "add", "carla", "--empty-password"});
+    EXPECT_EQ(added.at("changed"), true);
+    EXPECT_EQ(std::to_string(added.at("uid").get<int>()), Fields(passwd, "carla").at(2));
+    const json group = run({"group", "add", "staff"});
+    EXPECT_EQ(std::to_string(group.at("gid").get<int>()), Fields(groups, "staff").at(2));
 }
 
 TEST_F(TavoctlAccounts, CheckNamesEveryDifferenceAndRepairsNone)

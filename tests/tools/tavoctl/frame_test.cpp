@@ -93,7 +93,7 @@ TEST(TavoctlFrame, WrongCommandLinesAreUsageAndSayNothingOnStandardOutput)
         {"group", "rename", "users", "folks"},
         {"quota", "on"},
         {"quota", "on", "one"},
-        {"quota", "on", "99"},
+        {"quota", "on", "0"},
         {"quota", "set", "admin", "1"},
         {"quota", "set", "admin", "1", "much"},
         {"quota", "set", "admin", "1", "--", "-1M"},

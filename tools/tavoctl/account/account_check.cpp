@@ -4,7 +4,7 @@
 #include "account/account_key.h"
 #include "frame/failure.h"
 #include "frame/private_copy.h"
-#include "frame/table.h"
+#include "frame/terminal_text.h"
 
 #include "tavo_bdb.h"
 
@@ -55,7 +55,7 @@ class OpenStore {
     TAVOBDB *db_;
 };
 
-bool IsMissing(const char *path)
+bool IsAway(const char *path)
 {
     struct stat state = {};
     return ::lstat(path, &state) != 0;
@@ -77,14 +77,6 @@ std::optional<LinesByKey> ReadStore(const char *path, std::string &reason)
     return store ? store.Entries() : std::nullopt;
 }
 
-std::string Names(const std::vector<std::string> &names)
-{
-    std::string text;
-    for (const std::string &name : names)
-        text += (text.empty() ? "" : ", ") + name;
-    return text;
-}
-
 // Which fields of the two lines differ. What they hold is not for everybody's eyes.
 std::string Difference(const std::string &in_file, const std::string &in_store, const std::vector<std::string> &names)
 {
@@ -96,7 +88,7 @@ std::string Difference(const std::string &in_file, const std::string &in_store, 
     for (std::size_t i = 0; i < a.size(); ++i)
         if (a[i] != b[i])
             differing.push_back(names[i]);
-    return "file and store differ in " + Names(differing);
+    return "file and store differ in " + Joined(differing, ", ");
 }
 
 // Daemons may share an id among themselves; people, and root, must not.
@@ -134,7 +126,7 @@ void AccountCheck::ReadFile(std::size_t index)
 {
     const CheckedFile &file = files_[index];
     std::ifstream in(file.path);
-    if (!in && IsMissing(file.path))
+    if (!in && IsAway(file.path))
         return Add("", file.path, "the file is missing");
     if (!in)
         throw LibraryFailure(std::string("read ") + file.path);
@@ -199,7 +191,7 @@ void AccountCheck::CheckIds()
     }
     for (const auto &[id, names] : holders)
         if (names.size() > 1 && MustBeAlone(id))
-            Add("", files_[0].path, "the id " + std::to_string(id) + " is shared: " + Names(names));
+            Add("", files_[0].path, "the id " + std::to_string(id) + " is shared: " + Joined(names, ", "));
     for (const auto &[id, key] : *ids)
         if (!lines_[0].contains(key))
             Add("", id_store_, "the id " + id + " leads to " + key + ", which is no account");
@@ -207,10 +199,10 @@ void AccountCheck::CheckIds()
 
 const std::vector<Finding> &AccountCheck::Run()
 {
-    bool none = IsMissing(id_store_);
+    bool none = IsAway(id_store_);
     for (std::size_t i = 0; i < files_.size(); ++i) {
         ReadFile(i);
-        none = none && IsMissing(files_[i].store);
+        none = none && IsAway(files_[i].store);
     }
     if (none)
         return findings_;  // after a start of the machine: they are built when they are needed
@@ -220,13 +212,10 @@ const std::vector<Finding> &AccountCheck::Run()
     return findings_;
 }
 
-int AccountCheck::Print(const Call &call) const
+void AccountCheck::Print(Call &call) const
 {
-    Table table({"name", "file", "finding"});
-    for (const Finding &finding : findings_)
-        table.Add({finding.name.empty() ? Cell() : Cell(finding.name), finding.file, finding.text});
-    call.Print(table);
-    return findings_.empty() ? exit_done : exit_failed;
+    call.List(finding_columns, findings_);
+    call.status = findings_.empty() ? exit_done : exit_failed;
 }
 
 }  // namespace tavoctl

@@ -22,6 +22,12 @@ struct Finding {
     std::string text;
 };
 
+inline constexpr Column<Finding> finding_columns[] = {
+    {"name", [](const Finding &finding) { return Maybe(finding.name); }, "of the account; null: the whole file"},
+    {"file", field<&Finding::file>},
+    {"finding", field<&Finding::text>},
+};
+
 using LinesByKey = std::map<std::string, std::string>;
 
 class AccountCheck {
@@ -35,7 +41,7 @@ class AccountCheck {
     void Add(const std::string &name, const std::string &file, const std::string &text);
 
     // The findings, and the exit status that they give.
-    int Print(const Call &call) const;
+    void Print(Call &call) const;
 
   private:
     void ReadFile(std::size_t index);

@@ -1,6 +1,8 @@
 // Lists of accounts in files.
 #include "account/account_rows.h"
 
+#include "account/account_verbs.h"
+
 #include "frame/failure.h"
 
 #include <nlohmann/json.hpp>
@@ -59,7 +61,7 @@ std::vector<AccountRow> ParseCsv(std::string_view text, const std::vector<std::s
     for (const std::string &head : heads) {
         CheckColumn(head, columns);
         if (std::count(heads.begin(), heads.end(), head) > 1)
-            Refuse("the column \"" + head + "\" is there twice");
+            Refuse("duplicate column \"" + head + "\"");
     }
     std::vector<AccountRow> rows;
     while (!text.empty()) {
@@ -104,7 +106,7 @@ std::vector<AccountRow> ParseJson(std::string_view text, const std::vector<std::
     for (const nlohmann::json &object : list) {
         AccountRow row = {static_cast<int>(rows.size()) + 1, {}};
         if (!object.is_object())
-            Refuse(row.Where() + " is no object");
+            Refuse(row.Where() + " is not an object");
         for (const auto &[column, value] : object.items()) {
             CheckColumn(column, columns);
             if (!value.is_null())
@@ -133,7 +135,7 @@ std::vector<AccountRow> ParseAccountRows(std::string_view text, const std::vecto
     if (text.starts_with(byte_order_mark))
         text.remove_prefix(byte_order_mark.size());
     if (text.find('\0') != std::string_view::npos)
-        Refuse("it is no text");
+        Refuse("it is not text");
     const std::size_t begin = text.find_first_not_of(" \t\r\n");
     if (begin == std::string_view::npos)
         return {};
@@ -143,6 +145,11 @@ std::vector<AccountRow> ParseAccountRows(std::string_view text, const std::vecto
         if (const std::string *name = row.Find("name"); !name || name->empty())
             Refuse(row.Where() + " has no name");
     return rows;
+}
+
+void Export(const Call &call, const Table &table, const std::optional<std::string> &path)
+{
+    WriteWhole(path.value_or(""), call.json ? table.Json() + "\n" : table.Csv());
 }
 
 }  // namespace tavoctl

@@ -40,14 +40,15 @@ int LastUserId()
 void WarnOfReusedId(const std::string &name, int uid, int last_before)
 {
     if (uid <= last_before)
-        Warn("the user id " + std::to_string(uid) + " was somebody's before: files that he left now belong to " + name);
+        Warn("the user id " + std::to_string(Id(uid)) + " was somebody's before: files that he left now belong to " +
+             name);
 }
 
 void RefuseTakenId(const std::string &name, int uid)
 {
     const std::optional<User> holder = FindUserById(uid);
     if (holder && ::strcasecmp(holder->name.c_str(), name.c_str()) != 0)
-        throw UsageFailure("give " + name + " the user id " + std::to_string(uid), "it is that of " + holder->name);
+        throw UsageFailure("give " + name + " the user id " + std::to_string(Id(uid)), "it is that of " + holder->name);
 }
 
 void RefuseTooMany(int additions, const std::string &attempted)
@@ -75,13 +76,6 @@ void DeleteAll(const std::vector<std::string> &names, int (*remove)(const char *
             failure.reason = name + " is still there";
             throw failure;
         }
-}
-
-bool ParseYesNo(const std::string &what, const std::string &text)
-{
-    if (text != "yes" && text != "no")
-        throw UsageFailure("understand " + what + " " + text, "it is neither yes nor no");
-    return text == "yes";
 }
 
 }  // namespace tavoctl

@@ -30,8 +30,6 @@ void RefuseTooMany(int additions, const std::string &attempted);
 void DeleteAll(const std::vector<std::string> &names, int (*remove)(const char *const *, int),
                bool (*is_there)(const std::string &), const std::string &attempted);
 
-bool ParseYesNo(const std::string &what, const std::string &text);
-
 }  // namespace tavoctl
 
 #endif

@@ -1,90 +1,278 @@
-// tavoctl group: reading groups. What changes them stands in files of its own.
+// tavoctl group: local groups.
+#include "account/account_check.h"
+#include "account/account_verbs.h"
 #include "account/group_record.h"
-#include "account/group_verbs.h"
+#include "account/user_record.h"
 #include "families.h"
-#include "frame/failure.h"
+#include "frame/held_locks.h"
 #include "frame/program.h"
-#include "frame/table.h"
+#include "frame/progress.h"
+
+#include "tavo_group.h"
+#include "tavo_lock.h"
 
 #include <algorithm>
+#include <fstream>
+#include <set>
+
+#include <strings.h>
 
 namespace tavoctl {
 namespace {
 
-class GroupList : public Verb {
-  public:
-    static constexpr VerbInfo info = {"list", reads,
-                                      "Lists the groups of people, and \"users\", to which everybody belongs. Groups "
-                                      "of the system are not listed.",
-                                      "tavoctl group list\n"
-                                      "tavoctl group list --part dev --json"};
+struct GroupKind {
+    using Record = Group;
+    static constexpr char noun[] = "group";
+    static constexpr char name_help[] = "the group, in any case";
+    static constexpr char delete_warning[] = "";
+    static constexpr bool guards_names = true;
+    static constexpr int exists_code = ERR_GROUP_EXISTS;
+    static constexpr const auto &columns = group_columns;
+    static constexpr const ArgumentKind &kind = group_kind;
+    static constexpr const ArgumentKind &new_kind = new_group_kind;
+    static constexpr auto remove = TAVOGroupDelete;
 
-    void Declare(Arguments &arguments) override
+    static Group WithMembers(Group group)
     {
-        arguments.Option("--prefix", "TEXT", prefix_, "only names that begin so, in any case");
-        arguments.Option("--part", "TEXT", part_, "only names that hold this, in any case");
+        group.members = GroupMembers(group.name);
+        return group;
     }
-
-    int Run(const Call &call) override
+    static std::vector<Group> All(const std::string &prefix, const std::string &part)
     {
-        if (!prefix_.empty() && !part_.empty())
-            throw UsageFailure("list the groups", "--prefix and --part cannot both be given");
-        Table table({"name", "gid", "description", "members"});
-        for (const std::string &name : GroupNames(prefix_, part_))
+        std::vector<Group> groups;
+        for (const std::string &name : GroupNames(prefix, part))
             if (const std::optional<Group> group = FindGroup(name))  // unless deleted since
-                table.Add({group->name, group->gid, group->description, GroupMembers(name)});
-        call.Print(table);
-        return exit_done;
+                groups.push_back(WithMembers(*group));
+        return groups;
     }
-
-  private:
-    std::string prefix_;
-    std::string part_;
-};
-
-class GroupShow : public Verb {
-  public:
-    static constexpr VerbInfo info = {"show", reads,
-                                      "Shows a group. Listed as members are those that are users; names that the "
-                                      "group file has beyond these are strangers.",
-                                      "tavoctl group show staff\n"
-                                      "tavoctl group show users --json"};
-
-    void Declare(Arguments &arguments) override { arguments.Text("NAME", name_, "the group, in any case", GroupNames); }
-
-    int Run(const Call &call) override
+    static std::optional<Group> Find(const std::string &name) { return FindGroup(name); }
+    static Group Read(const std::string &name) { return ReadGroup(name); }
+    static bool IsSystem(const Group &group) { return IsSystemGroup(group); }
+    static void RefuseDelete(const Group &, const std::string &) {}
+    static void RefuseId(const std::string &name, int gid) { RefuseTakenGroupId(name, gid); }
+    static void Set(const std::string &old_name, const Group &group, const std::string &attempted)
     {
-        const Group group = ReadGroup(name_);
-        const std::vector<std::string> members = GroupMembers(group.name);
-        Record record;
-        record.Add("name", group.name);
-        record.Add("kind", group.domain ? "domain" : "local");
-        record.Add("gid", group.gid);
-        record.Add("description", group.description);
-        record.Add("members", members);
-        std::vector<std::string> strangers;
-        for (const std::string &member : group.members)
-            if (std::find(members.begin(), members.end(), member) == members.end())
-                strangers.push_back(member);
-        record.Add("strangers", strangers);
-        call.Print(record);
-        return exit_done;
+        SetGroup(old_name, group, attempted);
     }
-
-  private:
-    std::string name_;
 };
+
+// As the user's name is written, whatever the case of the argument.
+std::vector<std::string> ExistingUsers(const std::string &list)
+{
+    std::vector<std::string> names = SplitNames(list);
+    for (std::string &name : names)
+        name = ReadUser(name).name;
+    return names;
+}
+
+bool SameName(const std::string &a, const std::string &b)
+{
+    return ::strcasecmp(a.c_str(), b.c_str()) == 0;
+}
+
+Action GroupShow(Arguments &in)
+{
+    const auto name = in.Text("NAME", group_kind, GroupKind::name_help);
+    return [=](Call &call) {
+        call.One(group_columns, GroupKind::WithMembers(ReadGroup(*name)));
+    };
+}
+
+Action GroupAdd(Arguments &in)
+{
+    const auto name = in.Text("NAME", new_group_kind, "the new group");
+    const auto gid = in.Number("--gid", "N", "group id");
+    const auto members = in.Option("--members", "USER,...", user_kind, "its members");
+    const auto description = in.Option("--description", "TEXT", any_text, "free text");
+    return [=](Call &call) {
+        const std::string attempted = "add the group " + *name;
+        if (FindGroup(*name))
+            throw Failure{.attempted = attempted, .code = ERR_GROUP_EXISTS};
+        Group group;
+        group.name = *name;
+        group.gid = static_cast<int>(gid->value_or(-1));
+        if (*gid)
+            RefuseTakenGroupId(group.name, group.gid);
+        group.members = ExistingUsers(members->value_or(""));
+        group.description = description->value_or("");
+        call.Compare("group " + *name, group_columns, std::optional<Group>(), std::optional(group));
+        CheckGroup(group, attempted);
+        if (!call.Proceed())
+            return;
+        SetGroup({}, group, attempted);
+        WarnOfName(group.name);
+        call.Tell("gid", Id(ReadGroup(*name).gid));
+    };
+}
+
+Action GroupModify(Arguments &in)
+{
+    const auto name = in.Text("NAME", group_kind, GroupKind::name_help);
+    const auto members = in.Option("--members", "USER,...", user_kind, "its members, in place of all that it has");
+    const auto join = in.Option("--join", "USER,...", user_kind, "further members");
+    const auto leave = in.Option("--leave", "USER,...", user_kind, "users that shall not be members any more");
+    const auto description = in.Option("--description", "TEXT", any_text, "free text");
+    const auto gid = in.Number("--gid", "N", "group id");
+    return [=](Call &call) {
+        const std::string attempted = "change the group " + *name;
+        if (!*members && !*join && !*leave && !*description && !*gid)
+            throw UsageFailure(attempted, "nothing to change was given");
+        const Group before = ReadGroup(*name);
+        Group group = before;
+        if ((*members || *join || *leave) && SameName(group.name, "users"))
+            throw UsageFailure("change the members of " + *name, "every user is one");
+        if (*members)
+            group.members = ExistingUsers(**members);
+        for (const std::string &user : ExistingUsers(join->value_or("")))
+            if (std::none_of(group.members.begin(), group.members.end(),
+                             [&](const std::string &member) { return SameName(member, user); }))
+                group.members.push_back(user);
+        for (const std::string &user : SplitNames(leave->value_or("")))
+            if (std::erase_if(group.members, [&](const std::string &member) { return SameName(member, user); }) == 0)
+                throw NotFound("take " + user + " out of the group " + *name, ERR_NO_SUCH_USER, "it is no member");
+        group.description = description->value_or(group.description);
+        if (*gid) {
+            RefuseTakenGroupId(group.name, static_cast<int>(**gid));
+            group.gid = static_cast<int>(**gid);
+        }
+        call.Compare("group " + before.name, group_columns, std::optional(before), std::optional(group));
+        CheckGroup(group, attempted);
+        if (call.Proceed())
+            SetGroup(*name, group, attempted);
+    };
+}
+
+Action GroupExport(Arguments &in)
+{
+    const auto path = in.Option("--output", "PATH", file_path, "a new file that only root can read (standard output)");
+    return [=](Call &call) {
+        std::vector<Group> groups = GroupKind::All({}, {});
+        std::erase_if(groups, IsSystemGroup);
+        Export(call, call.TableOf(group_export_columns, groups), *path);
+    };
+}
+
+Action GroupImport(Arguments &in)
+{
+    const auto path = in.Text("FILE", file_path, "the list, or - for standard input");
+    const auto update = in.Flag("--update", "change groups that are there, in place of refusing the list");
+    return [=](Call &call) {
+        ImportedRows<GroupKind> rows(*path, *update);
+        std::vector<std::pair<std::optional<Group>, Group>> wanted;
+        for (const AccountRow &row : ParseAccountRows(ReadWhole(*path), Names(group_export_columns))) {
+            const std::optional<Group> old = rows.Present(row);
+            Group group = old.value_or(Group{});
+            group.name = *row.Find("name");
+            if (const std::string *text = row.Find("description"))
+                group.description = *text;
+            if (const std::string *text = row.Find("members"))
+                group.members = ExistingUsers(*text);
+            if (const auto gid = rows.IdIn(row, "gid")) {
+                rows.TakeId(row, *gid);
+                group.gid = *gid;
+            }
+            CheckGroup(group, rows.Attempted(row));
+            const std::size_t before = call.report.changes.size();
+            call.Compare("group " + group.name, group_columns, old, std::optional(group));
+            if (call.report.changes.size() > before)
+                wanted.emplace_back(old, std::move(group));
+        }
+        if (!call.Proceed())
+            return;
+        Progress progress("importing");
+        for (std::size_t i = 0; i < wanted.size(); ++i) {
+            const auto &[old, group] = wanted[i];
+            progress.Show(std::to_string(i) + " of " + std::to_string(wanted.size()));
+            SetGroup(old ? std::optional(old->name) : std::nullopt, group,
+                     "import " + *path + ", " + std::to_string(i) + " groups are done, the next is " + group.name);
+        }
+    };
+}
+
+Action GroupCheck(Arguments &)
+{
+    return [](Call &call) {
+        AccountCheck check({{"/etc/group", TAVO_GROUP_DB_NAME, {"name", "password", "gid", "members"}},
+                            {"/etc/group_desc", TAVO_GROUP_DB_DESC, {"name", "description"}}},
+                           TAVO_GROUP_DB_ID);
+        const HeldLocks lock(TAVO_LOCK_USER | TAVO_LOCK_GROUP, true, usual_wait);
+        check.Run();
+        std::set<std::string> users;
+        std::ifstream in("/etc/passwd");
+        for (std::string line; std::getline(in, line);)
+            users.insert(AccountKey(SplitFields(line)[0]));
+        for (const auto &[key, line] : check.Lines(0)) {
+            const std::vector<std::string> fields = SplitFields(line);
+            for (const std::string &member : SplitNames(fields[3]))
+                if (!users.contains(AccountKey(member)))
+                    check.Add(fields[0], "/etc/group", "the member " + member + " is no user");
+        }
+        check.Print(call);
+    };
+}
 
 }  // namespace
 
 void AddGroup(Program &program)
 {
     Family &group = program.Add("group", "Local groups");
-    group.Add<GroupList>();
-    group.Add<GroupShow>();
-    AddGroupChanges(group);
-    AddGroupTransfer(group);
-    AddGroupCheck(group);
+    group.Add("list", reads, Answer::List(group_columns), R"(Lists the groups of people, and "users", to which everybody
+belongs. Groups of the system are not listed.
+
+tavoctl group list
+tavoctl group list --part dev --json)",
+              AccountList<GroupKind>);
+    group.Add("show", reads, Answer::One(group_columns), R"(Shows a group. Listed as members are those that are users;
+names that the group file has beyond these are strangers.
+
+tavoctl group show staff
+tavoctl group show users --json)",
+              GroupShow);
+    group.Add("add", changes, Answer::Change(), R"(Adds a group. An id is chosen unless one is given.
+
+tavoctl group add staff
+tavoctl group add staff --members anna,berta --description "Everybody here")",
+              GroupAdd);
+    group.Add("modify", changes, Answer::Change(), R"(Changes the members, the description or the id of a group; what is
+not given stays.
+
+tavoctl group modify staff --join carla --leave anna,berta
+tavoctl group modify staff --members anna
+tavoctl group modify staff --description "")",
+              GroupModify);
+    group.Add("rename", changes, Answer::Change(), R"(Gives a group another name, also in the lists of shared folders
+and of Samba.
+
+tavoctl group rename staff team)",
+              AccountRename<GroupKind>);
+    group.Add("delete", changes | destroys, Answer::Change(), R"(Deletes groups, also from the lists of shared folders,
+all in one batch. Their members stay. Nothing is done when one of them is not there.
+
+tavoctl group delete staff
+tavoctl group delete --yes staff guests)",
+              AccountDelete<GroupKind>);
+    group.Add("import", changes, Answer::Change(),
+              R"(Adds the groups of a list, and with --update changes those that are
+there. The list is comma-separated values under a line of field names (name, gid, description, members), or the JSON of
+export. Only name is required. Everything is looked at before anything is changed; then it goes group by group, and
+stops at the first that fails.
+
+tavoctl group import --dry-run groups.csv
+tavoctl group import --update groups.json)",
+              GroupImport);
+    group.Add("export", reads, Answer::Document(group_export_columns), R"(Writes the groups of people as comma-separated
+values, or as JSON, in the form that import reads. Members are joined by commas in one field.
+
+tavoctl group export > groups.csv
+tavoctl group export --json)",
+              GroupExport);
+    group.Add("check", reads, Answer::List(finding_columns), R"(Compares the two files of groups with the library's
+stores, and names every difference, and every member that is not a user; exit status 1 when there is one. Nothing is
+changed. A file that was edited by hand differs until the library is used the next time, and then the file counts.
+
+tavoctl group check
+tavoctl group check --json)",
+              GroupCheck);
 }
 
 }  // namespace tavoctl

@@ -3,6 +3,7 @@
 
 #include "frame/containers.h"
 #include "frame/failure.h"
+#include "frame/suggestion.h"
 
 #include "tavo_group.h"
 
@@ -14,9 +15,9 @@
 namespace tavoctl {
 namespace {
 
-struct Owned {
+struct OwnedGroup {
     TAVOGROUP *group = nullptr;
-    ~Owned() { TAVOGroupFree(group); }
+    ~OwnedGroup() { TAVOGroupFree(group); }
 };
 
 std::string Description(const std::string &name)
@@ -28,7 +29,7 @@ std::string Description(const std::string &name)
     return TAVOGroupDescGet(name.c_str(), text.data(), size) > 0 ? text.c_str() : std::string();
 }
 
-Group FromRecord(const TAVOGROUP &record)
+Group GroupOf(const TAVOGROUP &record)
 {
     Group group = {.name = record.szName,
                    .gid = record.nGid,
@@ -49,9 +50,9 @@ bool EndsField(char c)
 
 std::optional<Group> FindGroup(const std::string &name)
 {
-    Owned owned;
+    OwnedGroup owned;
     if (TAVOGroupGet(name.c_str(), &owned.group) == 0)
-        return FromRecord(*owned.group);
+        return GroupOf(*owned.group);
     if (TLIBErrGet() == ERR_NO_SUCH_GROUP || TLIBErrGet() == ERR_INVALID_GROUPNAME)
         return {};
     throw LibraryFailure("read the group " + name);
@@ -61,7 +62,8 @@ Group ReadGroup(const std::string &name)
 {
     if (std::optional<Group> group = FindGroup(name))
         return *std::move(group);
-    throw NotFound("read the group " + name, ERR_NO_SUCH_GROUP, "tavoctl group list shows which are there");
+    throw NotFound("read the group " + name, ERR_NO_SUCH_GROUP,
+                   DidYouMean(name, GroupNames(), "tavoctl group list shows which are there"));
 }
 
 std::vector<std::string> GroupNames(const std::string &prefix, const std::string &part)
@@ -88,13 +90,17 @@ std::vector<std::string> GroupMembers(const std::string &name)
     return members.Items();
 }
 
-void SetGroup(const std::optional<std::string> &old_name, const Group &group, const std::string &attempted)
+void CheckGroup(const Group &group, const std::string &attempted)
 {
-    // Before the group is there: its description comes in a second call.
     if (std::any_of(group.description.begin(), group.description.end(), EndsField))
         throw Failure{.attempted = attempted,
                       .reason = "the description holds a colon or a control character",
                       .code = ERR_BAD_PARAMETERS};
+}
+
+void SetGroup(const std::optional<std::string> &old_name, const Group &group, const std::string &attempted)
+{
+    CheckGroup(group, attempted);
     std::vector<char *> members;
     for (const std::string &member : group.members)
         members.push_back(const_cast<char *>(member.c_str()));  // the library's record has no const; it does not write
@@ -117,9 +123,9 @@ bool IsSystemGroup(const Group &group)
 
 void RefuseTakenGroupId(const std::string &name, int gid)
 {
-    Owned owned;
+    OwnedGroup owned;
     if (TAVOGroupGetByGID(gid, &owned.group) == 0 && ::strcasecmp(owned.group->szName, name.c_str()) != 0)
-        throw UsageFailure("give " + name + " the group id " + std::to_string(gid),
+        throw UsageFailure("give " + name + " the group id " + std::to_string(Id(gid)),
                            std::string("it is that of ") + owned.group->szName);
 }
 
@@ -132,5 +138,26 @@ std::vector<std::string> SplitNames(const std::string &text)
             names.push_back(name);
     return names;
 }
+
+std::vector<std::string> StrangersOf(const Group &group)
+{
+    const std::optional<Group> stored = FindGroup(group.name);
+    std::vector<std::string> strangers = stored ? stored->members : std::vector<std::string>();
+    std::erase_if(strangers, [&](const std::string &name) {
+        return std::find(group.members.begin(), group.members.end(), name) != group.members.end();
+    });
+    return strangers;
+}
+
+const ArgumentKind group_kind = {.name = "group", .candidates = GroupNames, .sample = "nemos"};
+
+const ArgumentKind new_group_kind = {
+    .name = "new group",
+    .allowed = "1 to 15 letters, digits, \".\", \"-\", \"_\" and blanks, with neither \"-\" nor a blank first",
+    .valid = [](const std::string &name) { return BlTLIBIsGroupName(name.c_str()) == 1; },
+    .code = ERR_INVALID_GROUPNAME,
+    .sample = "nemos",
+    .wrong = "a,b",
+};
 
 }  // namespace tavoctl

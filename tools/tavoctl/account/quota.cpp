@@ -4,7 +4,6 @@
 #include "frame/failure.h"
 #include "frame/program.h"
 #include "frame/progress.h"
-#include "frame/table.h"
 #include "storage/mounted_volumes.h"
 
 #include "tavo_quota.h"
@@ -17,9 +16,24 @@ namespace {
 
 constexpr char volume_help[] = "number of the volume: 1 for /volume1";
 constexpr double kib_in_mb = 1024;
+constexpr int64_t most_volumes = 9999;
 
-// "1536K", "1.5M", "2G", "1T"; a number alone counts megabytes; "none" takes the limit away.
-float ParseLimit(const std::string &text)
+struct UserQuota {
+    std::string user;
+    int volume;
+    std::optional<int64_t> limit;  // KiB
+    int64_t used;
+};
+
+constexpr Column<UserQuota> quota_columns[] = {
+    {"volume", field<&UserQuota::volume>, "its number"},
+    {"user", field<&UserQuota::user>},
+    {"limit_kib", field<&UserQuota::limit>, "null: no limit", in_list, "KiB"},
+    {"used_bytes", field<&UserQuota::used>, "", in_list, "bytes"},
+};
+
+// Megabytes of "1536K", "1.5M", "2G", "1T" or a number alone; "none" takes the limit away.
+std::optional<double> LimitOf(const std::string &text)
 {
     if (text == "none")
         return 0;
@@ -29,167 +43,140 @@ float ParseLimit(const std::string &text)
     const std::string units = "KMGT";
     const std::size_t power = unit.empty() ? 1 : units.find(unit[0]);
     if (end == text.c_str() || unit.size() > 1 || power == std::string::npos || !std::isfinite(number) || number < 0)
-        throw UsageFailure("understand the limit " + text, "it is not of the form 1536K, 1.5M or 2G");
-    return static_cast<float>(number * std::pow(kib_in_mb, static_cast<double>(power) - 1));
-}
-
-Cell LimitCell(const TAVOQUOTA &quota)
-{
-    if (quota.rLimit <= 0)
         return {};
-    return static_cast<int64_t>(std::llround(static_cast<double>(quota.rLimit) * kib_in_mb));
+    return number * std::pow(kib_in_mb, static_cast<double>(power) - 1);
 }
 
-class QuotaSwitch : public Verb {
-  public:
-    void Declare(Arguments &arguments) override { arguments.Number("VOLUME", "VOLUME", volume_, volume_help); }
-
-  protected:
-    std::string Volume() const { return "volume " + std::to_string(volume_); }
-    int volume_ = -1;
+constexpr ArgumentKind limit_kind = {
+    .name = "limit",
+    .allowed = "1536K, 1.5M, 20G, 1T, a number of megabytes, or none",
+    .valid = [](const std::string &text) { return LimitOf(text).has_value(); },
+    .sample = "20G",
+    .wrong = "much",
 };
 
-class QuotaOn : public QuotaSwitch {
-  public:
-    static constexpr VerbInfo info = {"on", changes,
-                                      "Switches quotas on: remounts the volume with them, counts what every user has "
-                                      "there, and has the kernel enforce the limits. It takes a while on a full "
-                                      "volume, and nobody may write to it meanwhile.",
-                                      "tavoctl quota on 1"};
+std::optional<UserQuota> QuotaOf(const std::string &user, const MountedVolume &volume)
+{
+    TAVOQUOTA quota = {};
+    if (TAVOQuotaGet(user.c_str(), volume.device.c_str(), &quota) != 0)
+        return {};
+    UserQuota found = {user, volume.number, {}, static_cast<int64_t>(quota.cbUsed)};
+    if (quota.rLimit > 0)
+        found.limit = std::llround(static_cast<double>(quota.rLimit) * kib_in_mb);
+    return found;
+}
 
-    int Run(const Call &) override
-    {
+UserQuota ReadQuota(const std::string &user, const MountedVolume &volume)
+{
+    const auto quota = QuotaOf(user, volume);
+    Must(quota.has_value(), "read the limit of " + user + " on " + volume.path);
+    return *quota;
+}
+
+// on and off.
+Action QuotaSwitch(Arguments &in, bool on)
+{
+    const auto volume = in.Number("VOLUME", "VOLUME", volume_help, 1, most_volumes);
+    return [=](Call &call) {
+        const MountedVolume mounted = FindVolume(static_cast<int>(**volume));
+        const std::string attempted = std::string("switch quotas ") + (on ? "on" : "off") + " for " + mounted.path;
+        call.Change(mounted.path, "quotas", {}, on);
+        if (!call.Proceed())
+            return;
         Progress progress("switching quotas on");
-        progress.Show("counting what users have on " + Volume());
-        if (TAVOQuotaInit(volume_) != 0)
-            throw LibraryFailure("switch quotas on for " + Volume(),
-                                 TLIBErrGet() == ERR_BAD_PARAMETERS ? "mount the volume first"
-                                 : TLIBErrGet() == ERR_QUOTA_CHECK  ? "stop what writes to the volume"
-                                                                    : "");
-        return exit_done;
-    }
-};
+        if (on)
+            progress.Show("counting what users have on " + mounted.path);
+        const int result = on ? TAVOQuotaInit(mounted.number) : TAVOQuotaOff(mounted.number);
+        Must(result == 0, attempted, TLIBErrGet() == ERR_QUOTA_CHECK ? "stop what writes to the volume" : "");
+    };
+}
 
-class QuotaOff : public QuotaSwitch {
-  public:
-    static constexpr VerbInfo info = {"off", changes, "Switches quotas off. The limits stay for the next time.",
-                                      "tavoctl quota off 1"};
+Action QuotaSet(Arguments &in)
+{
+    const auto user = in.Text("USER", user_kind, user_help);
+    const auto number = in.Number("VOLUME", "VOLUME", volume_help, 1, most_volumes);
+    const auto limit = in.Text("LIMIT", limit_kind, "such as 20G, 1.5M, 1536K, or none");
+    return [=](Call &call) {
+        const auto megabytes = static_cast<float>(*LimitOf(*limit));
+        const MountedVolume volume = FindVolume(static_cast<int>(**number));
+        const UserQuota before = ReadQuota(*user, volume);
+        UserQuota after = before;
+        after.limit.reset();
+        if (megabytes > 0)
+            after.limit = std::llround(static_cast<double>(megabytes) * kib_in_mb);
+        call.Compare("user " + *user + " on " + volume.path, quota_columns, std::optional(before),
+                     std::optional(after));
+        if (call.Proceed())
+            Must(TAVOQuotaSet(user->c_str(), volume.device.c_str(), &megabytes) == 0,
+                 "limit " + *user + " on " + volume.path);
+    };
+}
 
-    int Run(const Call &) override
-    {
-        if (TAVOQuotaOff(volume_) != 0)
-            throw LibraryFailure("switch quotas off for " + Volume());
-        return exit_done;
-    }
-};
+Action QuotaGet(Arguments &in)
+{
+    const auto user = in.Text("USER", user_kind, user_help);
+    const auto number = in.Number("VOLUME", "VOLUME", volume_help, 1, most_volumes);
+    return [=](Call &call) {
+        call.One(quota_columns, ReadQuota(*user, FindVolume(static_cast<int>(**number))));
+    };
+}
 
-class QuotaSet : public Verb {
-  public:
-    static constexpr VerbInfo info = {"set", changes,
-                                      "Limits the space of a user on a volume; \"none\" takes the limit away. A number "
-                                      "without a unit counts megabytes.",
-                                      "tavoctl quota set anna 1 20G\n"
-                                      "tavoctl quota set anna 1 1536K\n"
-                                      "tavoctl quota set anna 1 none"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("USER", user_, "the account, in any case", UserNames);
-        arguments.Number("VOLUME", "VOLUME", volume_, volume_help);
-        arguments.Text("LIMIT", limit_, "such as 20G, 1.5M, 1536K, or none");
-    }
-
-    int Run(const Call &) override
-    {
-        const float limit = ParseLimit(limit_);
-        const MountedVolume volume = FindVolume(volume_);
-        if (TAVOQuotaSet(user_.c_str(), volume.device.c_str(), &limit) != 0)
-            throw LibraryFailure("limit " + user_ + " on " + volume.path);
-        return exit_done;
-    }
-
-  private:
-    std::string user_;
-    int volume_ = -1;
-    std::string limit_;
-};
-
-class QuotaGet : public Verb {
-  public:
-    static constexpr VerbInfo info = {"get", reads, "Shows the limit and the use of one user on a volume.",
-                                      "tavoctl quota get anna 1\n"
-                                      "tavoctl quota get anna 1 --json"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("USER", user_, "the account, in any case", UserNames);
-        arguments.Number("VOLUME", "VOLUME", volume_, volume_help);
-    }
-
-    int Run(const Call &call) override
-    {
-        const MountedVolume volume = FindVolume(volume_);
-        TAVOQUOTA quota = {};
-        if (TAVOQuotaGet(user_.c_str(), volume.device.c_str(), &quota) != 0)
-            throw LibraryFailure("read the limit of " + user_ + " on " + volume.path);
-        Record record;
-        record.Add("user", user_);
-        record.Add("volume", volume.number);
-        record.Add("limit_kib", LimitCell(quota));
-        record.Add("used_bytes", static_cast<int64_t>(quota.cbUsed));
-        call.Print(record);
-        return exit_done;
-    }
-
-  private:
-    std::string user_;
-    int volume_ = -1;
-};
-
-class QuotaReport : public Verb {
-  public:
-    static constexpr VerbInfo info = {"report", reads,
-                                      "Lists limit and use of every user on every volume that has quotas switched on, "
-                                      "or on one.",
-                                      "tavoctl quota report\n"
-                                      "tavoctl quota report 1 --json"};
-
-    void Declare(Arguments &arguments) override { arguments.OptionalText("VOLUME", volume_, volume_help); }
-
-    int Run(const Call &call) override
-    {
-        std::vector<MountedVolume> volumes =
-            volume_.empty() ? MountedVolumes() : std::vector<MountedVolume>{FindVolume(volume_)};
-        if (volume_.empty())
-            std::erase_if(volumes,
-                          [](const MountedVolume &volume) { return TAVOQuotaFmtGet(volume.device.c_str()) < 0; });
-        Table table({"volume", "user", "limit_kib", "used_bytes"});
+Action QuotaReport(Arguments &in)
+{
+    const auto number = in.OptionalText("VOLUME", volume_kind, volume_help);
+    return [=](Call &call) {
+        std::vector<MountedVolume> volumes = MountedVolumes();
+        if (*number)
+            volumes = {FindVolume(**number)};
+        else
+            std::erase_if(volumes, [](const MountedVolume &v) { return TAVOQuotaFmtGet(v.device.c_str()) < 0; });
+        std::vector<UserQuota> quotas;
         for (const MountedVolume &volume : volumes)
             for (const std::string &user : UserNames()) {
-                TAVOQUOTA quota = {};
-                if (TAVOQuotaGet(user.c_str(), volume.device.c_str(), &quota) == 0)
-                    table.Add({volume.number, user, LimitCell(quota), static_cast<int64_t>(quota.cbUsed)});
+                if (const auto quota = QuotaOf(user, volume))
+                    quotas.push_back(*quota);
                 else if (TLIBErrGet() != ERR_NO_SUCH_USER)  // deleted since
                     throw LibraryFailure("read the limit of " + user + " on " + volume.path);
             }
-        call.Print(table);
-        return exit_done;
-    }
-
-  private:
-    std::string volume_;
-};
+        call.List(quota_columns, quotas);
+    };
+}
 
 }  // namespace
 
 void AddQuota(Program &program)
 {
     Family &quota = program.Add("quota", "Limits on the space of users");
-    quota.Add<QuotaOn>();
-    quota.Add<QuotaOff>();
-    quota.Add<QuotaSet>();
-    quota.Add<QuotaGet>();
-    quota.Add<QuotaReport>();
+    quota.Add("on", changes, Answer::Change(), R"(Switches quotas on: remounts the volume with them, counts what every
+user has there, and has the kernel enforce the limits. It takes a while on a full volume, and nobody may write to it
+meanwhile.
+
+tavoctl quota on 1)",
+              [](Arguments &in) { return QuotaSwitch(in, true); });
+    quota.Add("off", changes, Answer::Change(), R"(Switches quotas off. The limits stay for the next time.
+
+tavoctl quota off 1)",
+              [](Arguments &in) { return QuotaSwitch(in, false); });
+    quota.Add("set", changes, Answer::Change(),
+              R"(Limits the space of a user on a volume; "none" takes the limit away. A
+number without a unit counts megabytes.
+
+tavoctl quota set anna 1 20G
+tavoctl quota set anna 1 1536K
+tavoctl quota set anna 1 none)",
+              QuotaSet);
+    quota.Add("get", reads, Answer::One(quota_columns), R"(Shows the limit and the use of one user on a volume.
+
+tavoctl quota get anna 1
+tavoctl quota get anna 1 --json)",
+              QuotaGet);
+    quota.Add("report", reads, Answer::List(quota_columns),
+              R"(Lists limit and use of every user on every volume that has
+quotas switched on, or on one.
+
+tavoctl quota report
+tavoctl quota report 1 --json)",
+              QuotaReport);
 }
 
 }  // namespace tavoctl

@@ -1,131 +1,153 @@
-// tavoctl user: reading accounts. What changes them stands in files of its own.
+// tavoctl user: local users.
+#include "account/account_check.h"
 #include "account/user_verbs.h"
-
-#include "account/user_record.h"
 #include "families.h"
-#include "frame/containers.h"
-#include "frame/failure.h"
+#include "frame/held_locks.h"
 #include "frame/program.h"
 
-#include "tavo_group.h"
+#include "tavo_lock.h"
+
+#include <limits>
 
 #include <strings.h>
 
 namespace tavoctl {
+
+std::vector<User> UserKind::All(const std::string &prefix, const std::string &part)
+{
+    std::vector<User> users;
+    for (const std::string &name : UserNames(prefix, part))
+        if (const std::optional<User> user = FindUser(name))  // unless deleted since
+            users.push_back(*user);
+    return users;
+}
+
+void UserKind::RefuseDelete(const User &user, const std::string &attempted)
+{
+    if (::strcasecmp(user.name.c_str(), "root") == 0 || ::strcasecmp(user.name.c_str(), "admin") == 0)
+        throw Failure{.attempted = attempted, .hint = "it must stay", .code = ERR_USER_DB_DELETE};
+}
+
 namespace {
 
-std::vector<std::string> GroupsOf(const std::string &user)
+Action UserShow(Arguments &in)
 {
-    StringList names;
-    if (TAVOGroupEnum(names.Address(), TAVO_GROUP_LOCAL | TAVO_GROUP_DOMAIN) < 0)
-        throw LibraryFailure("list the groups");
-    std::vector<std::string> groups;
-    for (const std::string &group : names.Items()) {
-        StringList members;
-        if (TAVOGroupListMember(group.c_str(), members.Address()) < 0)
-            throw LibraryFailure("list the members of " + group);
-        for (const std::string &member : members.Items())
-            if (::strcasecmp(member.c_str(), user.c_str()) == 0)
-                groups.push_back(group);
-    }
-    return groups;
-}
-
-const char *PasswordState(const std::string &hash)
-{
-    if (hash.empty())
-        return "none";
-    return hash.front() == '*' || hash.front() == '!' ? "locked" : "set";
-}
-
-class UserList : public Verb {
-  public:
-    static constexpr VerbInfo info = {"list", reads,
-                                      "Lists the accounts of people. Accounts of the system are not listed; the guest "
-                                      "is where the model has one.",
-                                      "tavoctl user list\n"
-                                      "tavoctl user list --prefix a --json"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Option("--prefix", "TEXT", prefix_, "only names that begin so, in any case");
-        arguments.Option("--part", "TEXT", part_, "only names that hold this, in any case");
-    }
-
-    int Run(const Call &call) override
-    {
-        if (!prefix_.empty() && !part_.empty())
-            throw UsageFailure("list the users", "--prefix and --part cannot both be given");
-        Table table({"name", "uid", "gid", "description", "mail", "expires", "expired"});
-        for (const std::string &name : UserNames(prefix_, part_))
-            if (const std::optional<User> user = FindUser(name))  // unless deleted since
-                table.Add({user->name, user->uid, user->gid, user->description, user->mail, ExpiryCell(user->expires),
-                           TAVOUserIsExpired(user->expires) == 1});
-        call.Print(table);
-        return exit_done;
-    }
-
-  private:
-    std::string prefix_;
-    std::string part_;
-};
-
-class UserShow : public Verb {
-  public:
-    static constexpr VerbInfo info = {"show", reads,
-                                      "Shows everything about one account, but no hash: of the password, whether it is "
-                                      "set, none, or locked.",
-                                      "tavoctl user show anna\n"
-                                      "tavoctl user show --uid 1026 --json"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.OptionalText("NAME", name_, user_help, UserNames);
-        arguments.Number("--uid", "N", uid_, "the account with this id, in place of a name");
-    }
-
-    int Run(const Call &call) override
-    {
-        if (name_.empty() == (uid_ < 0))
+    const auto name = in.OptionalText("NAME", user_kind, user_help);
+    const auto uid = in.Number("--uid", "N", "the account with this id, in place of a name", 0,
+                               std::numeric_limits<uint32_t>::max());
+    return [=](Call &call) {
+        if (name->has_value() == uid->has_value())
             throw UsageFailure("show a user", "give a name, or --uid");
-        std::optional<User> user = uid_ < 0 ? FindUser(name_) : FindUserById(uid_);
+        if (*name)
+            return call.One(user_columns, ReadUser(**name));
+        const std::optional<User> user = FindUserById(static_cast<int>(**uid));
         if (!user)
-            throw NotFound("show the user " + (uid_ < 0 ? name_ : std::to_string(uid_)), ERR_NO_SUCH_USER);
-        Record record;
-        record.Add("name", user->name);
-        record.Add("kind", user->kind == TAVO_USER_KIND_DOMAIN ? "domain" : "local");
-        record.Add("uid", user->uid);
-        record.Add("gid", user->gid);
-        record.Add("description", user->description);
-        record.Add("home", user->home);
-        record.Add("shell", user->shell);
-        record.Add("mail", user->mail);
-        record.Add("privilege", PrivilegeText(user->privilege));
-        record.Add("password", PasswordState(user->password));
-        record.Add("cannot_change_password", user->cannot_change_password);
-        record.Add("expires", ExpiryCell(user->expires));
-        record.Add("expired", TAVOUserIsExpired(user->expires) == 1);
-        record.Add("groups", GroupsOf(user->name));
-        call.Print(record);
-        return exit_done;
-    }
+            throw NotFound("show the user " + std::to_string(**uid), ERR_NO_SUCH_USER);
+        call.One(user_columns, *user);
+    };
+}
 
-  private:
-    std::string name_;
-    int uid_ = -1;
-};
+Action UserCheck(Arguments &)
+{
+    return [](Call &call) {
+        AccountCheck check(
+            {{"/etc/passwd", TAVO_USER_DB_NAME, {"name", "password", "uid", "gid", "description", "home", "shell"}},
+             {"/etc/shadow",
+              TAVO_USER_DB_SHADOW,
+              {"name", "password", "last change", "least age", "most age", "warning", "inactive", "expiry",
+               "reserved"}},
+             {"/etc/tavouser.conf", TAVO_USER_DB_MISC, {"name", "privilege", "mail"}},
+             {"/usr/tavo/etc/private/smbpasswd",
+              TAVO_USER_DB_SMB,
+              {"name", "uid", "LM hash", "NT hash", "flags", "last change", "end"}}},
+            TAVO_USER_DB_UID);
+        const HeldLocks lock(TAVO_LOCK_USER, true, usual_wait);
+        check.Run();
+        for (const auto &[key, line] : check.Lines(0))
+            if (!check.Lines(1).contains(key))
+                check.Add(SplitFields(line)[0], "/etc/shadow", "it is missing: no login");
+        check.Print(call);
+    };
+}
 
 }  // namespace
 
 void AddUser(Program &program)
 {
     Family &user = program.Add("user", "Local users");
-    user.Add<UserList>();
-    user.Add<UserShow>();
-    AddUserChanges(user);
-    AddUserImport(user);
-    AddUserExport(user);
-    AddUserCheck(user);
+    user.Add("list", reads, Answer::List(user_columns), R"(Lists the accounts of people. Accounts of the system are not
+listed; the guest is where the model has one.
+
+tavoctl user list
+tavoctl user list --prefix a --json)",
+             AccountList<UserKind>);
+    user.Add("show", reads, Answer::One(user_columns), R"(Shows everything about one account, but no hash: of the
+password, whether it is set, none, or locked.
+
+tavoctl user show anna
+tavoctl user show --uid 1026 --json)",
+             UserShow);
+    user.Add("add", changes, Answer::Change(), R"(Adds an account. The password is asked for, or is the first line of
+standard input; an id is chosen unless one is given.
+
+tavoctl user add anna --description "Anna Berg"
+tavoctl user add guest2 --empty-password --expires 2027-01-31
+pwgen 16 1 | tavoctl user add backup)",
+             UserAdd);
+    user.Add("modify", changes, Answer::Change(), R"(Changes facts of an account; what is not given stays. Its name is
+changed by rename, its password by passwd.
+
+tavoctl user modify anna --mail anna@example.com
+tavoctl user modify anna --description "" --privilege 0x23)",
+             UserModify);
+    user.Add("rename", changes, Answer::Change(), R"(Gives an account another name, also one that differs in case only.
+Id, password, groups, shared folders and home folder go with it.
+
+tavoctl user rename anna anna.berg)",
+             AccountRename<UserKind>);
+    user.Add("delete", changes | destroys, Answer::Change(),
+             R"(Deletes accounts with their quotas, group memberships and
+home folders, all in one batch. Nothing is done when one of them is not there.
+
+tavoctl user delete anna
+tavoctl user delete --yes anna berta carla)",
+             AccountDelete<UserKind>);
+    user.Add("passwd", changes, Answer::Change(),
+             R"(Sets the password of an account, also for Samba. It is asked for, or
+is the first line of standard input.
+
+tavoctl user passwd anna
+tavoctl user passwd anna < /root/new-password)",
+             UserPasswd);
+    user.Add("expire", changes, Answer::Change(), R"(Sets the last day of an account, which is valid through that whole
+day, or takes the limit away. `user show` says whether an account has expired.
+
+tavoctl user expire anna 2027-01-31
+tavoctl user expire anna never)",
+             UserExpire);
+    user.Add("import", changes, Answer::Change(), R"(Adds the accounts of a list in one batch, and with --update changes
+those that are there. The list is comma-separated values under a line of field names, or the JSON of export; the fields
+are those of export, and password in clear text. Only name is required. Everything is looked at before anything is
+changed.
+
+tavoctl user import --dry-run users.csv
+tavoctl user import --update --unknown-password users.csv
+tavoctl user export --json | ssh other tavoctl user import -)",
+             UserImport);
+    user.Add("export", reads, Answer::Document(user_export_columns), R"(Writes the accounts of people as comma-separated
+values, or as JSON, in the form that import reads. Password hashes only when asked for: who has them can log in to
+Samba.
+
+tavoctl user export > users.csv
+tavoctl user export --json --hashes --output /root/users.json)",
+             UserExport);
+    user.Add("check", reads, Answer::List(finding_columns), R"(Compares the four files of accounts with the library's
+stores, and the files with each other, and names every difference; exit status 1 when there is one. Nothing is changed.
+A file that was edited by hand differs until the library is used the next time, and then the file counts.
+
+tavoctl user check
+tavoctl user check --json)",
+             UserCheck);
 }
 
 }  // namespace tavoctl

@@ -4,6 +4,9 @@
 #include "frame/containers.h"
 #include "frame/error_codes.h"
 #include "frame/failure.h"
+#include "frame/suggestion.h"
+
+#include "tavo_group.h"
 
 #include <algorithm>
 #include <charconv>
@@ -23,12 +26,12 @@ char *Pointer(const std::string &text)
     return const_cast<char *>(text.c_str());  // the library's record has no const; it does not write
 }
 
-struct Owned {
+struct OwnedUser {
     TAVOUSER *user = nullptr;
-    ~Owned() { TAVOUserFree(user); }
+    ~OwnedUser() { TAVOUserFree(user); }
 };
 
-User FromRecord(const TAVOUSER &record)
+User UserOf(const TAVOUSER &record)
 {
     return {.name = record.szName,
             .password = record.szPasswd,
@@ -45,11 +48,11 @@ User FromRecord(const TAVOUSER &record)
 }
 
 template <class Get>
-std::optional<User> Find(const std::string &attempted, Get get)
+std::optional<User> UserBy(const std::string &attempted, Get get)
 {
-    Owned owned;
+    OwnedUser owned;
     if (get(&owned.user) == 0)
-        return FromRecord(*owned.user);
+        return UserOf(*owned.user);
     if (TLIBErrGet() == ERR_NO_SUCH_USER || TLIBErrGet() == ERR_INVALID_USERNAME)
         return {};
     throw LibraryFailure(attempted);
@@ -74,7 +77,7 @@ bool IsDone(const UserChange &change)
            now->cannot_change_password == wanted.cannot_change_password;
 }
 
-std::string Named(const std::vector<std::string> &names)
+std::string SomeOf(const std::vector<std::string> &names)
 {
     std::string text;
     for (std::size_t i = 0; i < names.size() && i < named_at_most; ++i)
@@ -104,20 +107,21 @@ TAVOUSER User::Record() const
 
 std::optional<User> FindUser(const std::string &name)
 {
-    return Find("read the user " + name, [&](TAVOUSER **record) { return TAVOUserGet(name.c_str(), record); });
+    return UserBy("read the user " + name, [&](TAVOUSER **record) { return TAVOUserGet(name.c_str(), record); });
 }
 
 std::optional<User> FindUserById(int uid)
 {
-    return Find("read the user with the id " + std::to_string(uid),
-                [&](TAVOUSER **record) { return TAVOUserGetByUID(uid, record); });
+    return UserBy("read the user with the id " + std::to_string(Id(uid)),
+                  [&](TAVOUSER **record) { return TAVOUserGetByUID(uid, record); });
 }
 
 User ReadUser(const std::string &name)
 {
     if (std::optional<User> user = FindUser(name))
         return *std::move(user);
-    throw NotFound("read the user " + name, ERR_NO_SUCH_USER, "tavoctl user list shows who is there");
+    throw NotFound("read the user " + name, ERR_NO_SUCH_USER,
+                   DidYouMean(name, UserNames(), "tavoctl user list shows who is there"));
 }
 
 std::vector<std::string> UserNames(const std::string &prefix, const std::string &part)
@@ -160,7 +164,7 @@ void SetUsers(const std::vector<UserChange> &changes, const std::string &attempt
         return;
     if (changes.size() > 1)
         failure.reason = std::to_string(refused.size()) + " of " + std::to_string(changes.size()) +
-                         " were refused, the others are done: " + Named(refused) + "; the last reason";
+                         " were refused, the others are done: " + SomeOf(refused) + "; the last reason";
     throw failure;
 }
 
@@ -169,21 +173,40 @@ bool IsSystemUser(const User &user)
     return user.kind == TAVO_USER_KIND_LOCAL && (user.uid < TAVO_USER_UID_MIN || user.uid == TAVO_USER_UID_GUEST);
 }
 
-int ParseExpiry(const std::string &text)
+namespace {
+
+std::optional<int> ExpiryOf(const std::string &text)
 {
     if (text.empty() || text == "never")
         return -1;
     std::string date = text;
     std::replace(date.begin(), date.end(), '-', '/');
     TAVOUSER record = {};
-    // What the library makes of a date before 1970 lies in the future.
+    // The library takes a date before 1970 for one in the far future.
     if (TAVOUserExpiredDateFill(&record, date.c_str()) != 0 || date < "1970/01/01")
-        throw UsageFailure("understand the date " + text, "it is not of the form yyyy/mm/dd, from 1970 on",
-                           "give the last day, or never");
+        return {};
     return record.nExpired;
 }
 
-Cell ExpiryCell(int day)
+std::optional<int> PrivilegeOf(const std::string &text)
+{
+    const bool hexadecimal = ::strncasecmp(text.c_str(), "0x", 2) == 0;
+    const char *end = text.c_str() + text.size();
+    int mask = 0;
+    const auto [stop, error] = std::from_chars(text.c_str() + (hexadecimal ? 2 : 0), end, mask, hexadecimal ? 16 : 10);
+    return error == std::errc() && stop == end && mask >= 0 ? std::optional(mask) : std::nullopt;
+}
+
+}  // namespace
+
+int ParseExpiry(const std::string &text)
+{
+    if (const auto day = ExpiryOf(text))
+        return *day;
+    throw UsageFailure("take " + text + " as a date", std::string("allowed: ") + date_kind.allowed);
+}
+
+std::optional<std::string> ExpiryText(int day)
 {
     if (day < 0)
         return {};
@@ -191,20 +214,15 @@ Cell ExpiryCell(int day)
     std::tm date = {};
     ::gmtime_r(&at, &date);
     char text[32];
-    std::strftime(text, sizeof text, "%Y/%m/%d", &date);
+    std::strftime(text, sizeof text, "%Y-%m-%d", &date);
     return text;
 }
 
 int ParsePrivilege(const std::string &text)
 {
-    const bool hexadecimal = ::strncasecmp(text.c_str(), "0x", 2) == 0;
-    const char *begin = text.c_str() + (hexadecimal ? 2 : 0);
-    const char *end = text.c_str() + text.size();
-    int mask = 0;
-    const auto [stop, error] = std::from_chars(begin, end, mask, hexadecimal ? 16 : 10);
-    if (error != std::errc() || stop != end || mask < 0)
-        throw UsageFailure("understand the privileges " + text, "it is no mask such as 0x23");
-    return mask;
+    if (const auto mask = PrivilegeOf(text))
+        return *mask;
+    throw UsageFailure("take " + text + " as privileges", std::string("allowed: ") + privilege_kind.allowed);
 }
 
 std::string PrivilegeText(int privilege)
@@ -213,5 +231,54 @@ std::string PrivilegeText(int privilege)
     std::snprintf(text, sizeof text, "0x%02X", static_cast<unsigned>(privilege));
     return text;
 }
+
+std::vector<std::string> GroupsOf(const std::string &user)
+{
+    StringList names;
+    Must(TAVOGroupEnum(names.Address(), TAVO_GROUP_LOCAL | TAVO_GROUP_DOMAIN) >= 0, "list the groups");
+    std::vector<std::string> groups;
+    for (const std::string &group : names.Items()) {
+        StringList members;
+        Must(TAVOGroupListMember(group.c_str(), members.Address()) >= 0, "list the members of " + group);
+        for (const std::string &member : members.Items())
+            if (::strcasecmp(member.c_str(), user.c_str()) == 0)
+                groups.push_back(group);
+    }
+    return groups;
+}
+
+const char *PasswordState(const std::string &hash)
+{
+    if (hash.empty())
+        return "none";
+    return hash.front() == '*' || hash.front() == '!' ? "locked" : "set";
+}
+
+const ArgumentKind user_kind = {.name = "user", .candidates = UserNames, .sample = "nemo"};
+
+const ArgumentKind new_user_kind = {
+    .name = "new user",
+    .allowed = "1 to 64 letters, digits, \".\", \"-\", \"_\" and blanks, with a letter or digit first",
+    .valid = [](const std::string &name) { return BlTLIBIsUserName(name.c_str()) == 1; },
+    .code = ERR_INVALID_USERNAME,
+    .sample = "nemo",
+    .wrong = "a:b",
+};
+
+const ArgumentKind date_kind = {
+    .name = "date",
+    .allowed = "yyyy-mm-dd from 1970 on, or never",
+    .valid = [](const std::string &text) { return ExpiryOf(text).has_value(); },
+    .sample = "2037-01-31",
+    .wrong = "soon",
+};
+
+const ArgumentKind privilege_kind = {
+    .name = "privileges",
+    .allowed = "a mask such as 0x23",
+    .valid = [](const std::string &text) { return PrivilegeOf(text).has_value(); },
+    .sample = "0x23",
+    .wrong = "many",
+};
 
 }  // namespace tavoctl

@@ -2,7 +2,8 @@
 #ifndef TAVOCTL_USER_RECORD_H
 #define TAVOCTL_USER_RECORD_H
 
-#include "frame/table.h"
+#include "frame/argument_kind.h"
+#include "frame/column.h"
 
 #include "tavo_user.h"
 
@@ -34,8 +35,9 @@ std::optional<User> FindUser(const std::string &name);  // throws a Failure when
 User ReadUser(const std::string &name);                 // throws a Failure, also when there is none
 std::optional<User> FindUserById(int uid);
 
-// The names that the library lists, in its order; for completion too.
 inline constexpr char user_help[] = "the account, in any case";
+
+// The names that the library lists, in its order; for completion too.
 std::vector<std::string> UserNames();
 std::vector<std::string> UserNames(const std::string &prefix, const std::string &part);
 
@@ -52,12 +54,48 @@ void SetUsers(const std::vector<UserChange> &changes, const std::string &attempt
 // The account is one of those that the system itself needs.
 bool IsSystemUser(const User &user);
 
-// "never", "" or "yyyy/mm/dd" (or with dashes), as a day number.
+// "never", "" or "yyyy-mm-dd" (or with slashes), as a day number.
 int ParseExpiry(const std::string &text);
-Cell ExpiryCell(int day);  // not known: never
+std::optional<std::string> ExpiryText(int day);  // nothing: never
 // A mask such as "0x23" or "35".
 int ParsePrivilege(const std::string &text);
 std::string PrivilegeText(int privilege);
+
+std::vector<std::string> GroupsOf(const std::string &user);
+const char *PasswordState(const std::string &hash);  // "set", "none" or "locked"
+
+// An id that the library has not chosen yet is not known.
+inline std::optional<uint32_t> ChosenId(int id)
+{
+    return id == -1 ? std::nullopt : std::optional(Id(id));
+}
+
+inline constexpr Column<User> user_columns[] = {
+    {"name", field<&User::name>},
+    {"kind", [](const User &u) -> std::string { return u.kind == TAVO_USER_KIND_DOMAIN ? "domain" : "local"; },
+     "local or domain", in_details},
+    {"uid", [](const User &u) { return ChosenId(u.uid); }, "user id"},
+    {"gid", [](const User &u) { return Id(u.gid == -1 ? TAVO_USER_GID_DEFAULT : u.gid); }, "id of the primary group"},
+    {"description", field<&User::description>},
+    {"home", [](const User &u) { return Maybe(u.home); }, "home folder", in_details},
+    {"shell", [](const User &u) { return Maybe(u.shell); }, "login shell", in_details},
+    {"mail", field<&User::mail>},
+    {"privilege", [](const User &u) { return PrivilegeText(u.privilege); }, "a mask, hexadecimal", in_details},
+    {"password", [](const User &u) -> std::string { return PasswordState(u.password); }, "set, none or locked",
+     in_details},
+    {"cannot_change_password", field<&User::cannot_change_password>, "", in_details},
+    {"expires", [](const User &u) { return ExpiryText(u.expires); }, "the last day, yyyy-mm-dd; null: never"},
+    {"expired",
+     [](const User &u) {
+         return TAVOUserIsExpired(u.expires) == 1;
+     }},
+    {"groups", [](const User &u) { return GroupsOf(u.name); }, "the groups that it is a member of", in_one},
+};
+
+extern const ArgumentKind user_kind;       // one that is there
+extern const ArgumentKind new_user_kind;   // a name for one
+extern const ArgumentKind date_kind;       // of the last day
+extern const ArgumentKind privilege_kind;  // a mask
 
 }  // namespace tavoctl
 

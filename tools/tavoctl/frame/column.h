@@ -131,6 +131,15 @@ std::vector<ColumnFacts> Facts(const Column<Record> (&columns)[Count])
     return facts;
 }
 
+template <class Record, std::size_t Count>
+std::vector<std::string> Names(const Column<Record> (&columns)[Count])
+{
+    std::vector<std::string> names;
+    for (const Column<Record> &column : columns)
+        names.emplace_back(column.facts.name);
+    return names;
+}
+
 }  // namespace tavoctl
 
 #endif

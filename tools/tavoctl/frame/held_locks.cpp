@@ -11,7 +11,7 @@
 namespace tavoctl {
 namespace {
 
-std::string Names(unsigned mask)
+std::string NamesOf(unsigned mask)
 {
     std::string names;
     for (const TLIBLOCKFILE *lock = rgslckList; lock->fLockBit; ++lock)
@@ -49,7 +49,7 @@ std::string LockName(const char *path)
 HeldLocks::HeldLocks(unsigned mask, bool shared, int64_t timeout) : mask_(mask)
 {
     const unsigned way = TAVO_LOCK_NONBLOCKING | (shared ? TAVO_LOCK_SHARED : TAVO_LOCK_EXCLUSIVE);
-    const std::string names = Names(mask);
+    const std::string names = NamesOf(mask);
     if (!Take(mask | way, static_cast<int>(timeout), names))
         throw LibraryFailure("take the lock " + names);
 }

@@ -117,17 +117,17 @@ std::string UnknownPassword()
     return password;
 }
 
-void PasswordChoice::Declare(Arguments &arguments)
+PasswordChoice::PasswordChoice(Arguments &in)
+    : empty_(in.Flag("--empty-password", "no password: anybody can log in")),
+      unknown_(in.Flag("--unknown-password", "one that nobody knows: nobody can log in until it is set"))
 {
-    arguments.Flag("--empty-password", empty_, "no password: anybody can log in");
-    arguments.Flag("--unknown-password", unknown_, "one that nobody knows: nobody can log in until it is set");
 }
 
 std::string PasswordChoice::For(const std::string &name) const
 {
-    if (empty_ && unknown_)
-        throw UsageFailure("choose a password", "--empty-password and --unknown-password are two");
-    return empty_ ? std::string() : unknown_ ? UnknownPassword() : AskPassword(name);
+    if (*empty_ && *unknown_)
+        throw UsageFailure("choose a password", "--empty-password and --unknown-password exclude each other");
+    return *empty_ ? std::string() : *unknown_ ? UnknownPassword() : AskPassword(name);
 }
 
 }  // namespace tavoctl

@@ -18,14 +18,14 @@ std::string UnknownPassword();
 // The options of a verb that gives accounts a password.
 class PasswordChoice {
   public:
-    void Declare(Arguments &arguments);
+    explicit PasswordChoice(Arguments &in);
     std::string For(const std::string &name) const;
     // Also without anybody who could be asked.
-    bool IsMade() const { return empty_ || unknown_; }
+    bool IsMade() const { return *empty_ || *unknown_; }
 
   private:
-    bool empty_ = false;
-    bool unknown_ = false;
+    Given<bool> empty_;
+    Given<bool> unknown_;
 };
 
 }  // namespace tavoctl

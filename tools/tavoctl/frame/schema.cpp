@@ -48,17 +48,20 @@ Json TypeOf(const ColumnFacts &column)
     return type;
 }
 
+enum class Details { few, some, all };  // which of the columns in_one are there: none, those that were chosen, all
+
 // Every field is there, and no other one.
-Json ObjectOf(const std::vector<ColumnFacts> &columns, bool details, Json properties)
+Json ObjectOf(const std::vector<ColumnFacts> &columns, Details details, Json properties)
 {
     Json required = Json::array();
     for (const auto &[name, type] : properties.items())
         required.push_back(name);
     for (const ColumnFacts &column : columns) {
-        if (column.place == in_one && !details)
+        if (column.place == in_one && details == Details::few)
             continue;
         properties[column.name] = TypeOf(column);
-        required.push_back(column.name);
+        if (column.place != in_one || details == Details::all)
+            required.push_back(column.name);
     }
     return {{"type", "object"},
             {"properties", std::move(properties)},
@@ -73,14 +76,14 @@ Json Version()
 
 Json OneOf(const std::vector<ColumnFacts> &columns)
 {
-    return ObjectOf(columns, true, Version());
+    return ObjectOf(columns, Details::all, Version());
 }
 
-Json ListOf(const std::vector<ColumnFacts> &columns)
+Json ListOf(const std::vector<ColumnFacts> &columns, Details details = Details::few)
 {
     Json properties = Version();
-    properties["items"] = {{"type", "array"}, {"items", ObjectOf(columns, false, Json::object())}};
-    return ObjectOf({}, true, std::move(properties));
+    properties["items"] = {{"type", "array"}, {"items", ObjectOf(columns, details, Json::object())}};
+    return ObjectOf({}, Details::all, std::move(properties));
 }
 
 Json ChangeSchema()
@@ -93,9 +96,9 @@ Json ChangeSchema()
     };
     Json properties = Version();
     properties["changed"] = {{"type", "boolean"}};
-    properties["changes"] = {{"type", "array"},
-                             {"items", ObjectOf({std::begin(columns), std::end(columns)}, true, Json::object())}};
-    Json schema = ObjectOf({}, true, std::move(properties));
+    properties["changes"] = {
+        {"type", "array"}, {"items", ObjectOf({std::begin(columns), std::end(columns)}, Details::all, Json::object())}};
+    Json schema = ObjectOf({}, Details::all, std::move(properties));
     schema["properties"]["dry_run"] = {{"const", true}};
     schema["properties"]["diff"] = {{"type", "string"}, {"description", "of the file that the verb edits"}};
     for (const char *id : {"uid", "gid"})
@@ -109,13 +112,13 @@ Json FailureSchema()
         {"attempted", "what could not be done", Kind::text, false, in_list, ""},
         {"status", "the exit status", Kind::number, false, in_list, ""},
     };
-    Json error = ObjectOf({std::begin(columns), std::end(columns)}, true, Json::object());
+    Json error = ObjectOf({std::begin(columns), std::end(columns)}, Details::all, Json::object());
     for (const char *name : {"reason", "code", "name", "module", "hint"})
         error["properties"][name] = {{"type", "string"}};
     error["properties"]["line"] = {{"type", "integer"}};
     Json properties = Version();
     properties["error"] = std::move(error);
-    return ObjectOf({}, true, std::move(properties));
+    return ObjectOf({}, Details::all, std::move(properties));
 }
 
 Json SchemaOf(const Answer &answer)
@@ -126,6 +129,8 @@ Json SchemaOf(const Answer &answer)
     case Answer::list:
         return answer.or_one.empty() ? ListOf(answer.columns)
                                      : Json{{"anyOf", {ListOf(answer.columns), OneOf(answer.or_one)}}};
+    case Answer::document:
+        return ListOf(answer.columns, Details::some);
     case Answer::change:
         return ChangeSchema();
     default:
@@ -169,6 +174,7 @@ std::string FormText(const Answer &answer)
     case Answer::one:
         return fields;
     case Answer::list:
+    case Answer::document:
         return "items: " + fields;
     case Answer::change:
         return "changes";

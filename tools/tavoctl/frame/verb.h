@@ -43,7 +43,7 @@ enum Trait : unsigned {
 
 // What a verb prints as JSON.
 struct Answer {
-    enum Form { nothing, one, list, change, other } form = other;
+    enum Form { nothing, one, list, document, change, other } form = other;
     std::vector<ColumnFacts> columns = {};
     std::vector<ColumnFacts> or_one = {};  // a list verb that can also show one thing
 
@@ -56,6 +56,12 @@ struct Answer {
     static Answer List(const Column<Facts_> (&columns)[Count])
     {
         return {list, Facts(columns), {}};
+    }
+    // A list that goes to a file or another program rather than to a terminal.
+    template <class Facts_, std::size_t Count>
+    static Answer Document(const Column<Facts_> (&columns)[Count])
+    {
+        return {document, Facts(columns), {}};
     }
     template <class Facts_, std::size_t Count>
     Answer OrOne(const Column<Facts_> (&columns_of_one)[Count]) const

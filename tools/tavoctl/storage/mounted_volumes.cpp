@@ -55,12 +55,17 @@ MountedVolume FindVolume(int number)
         .attempted = "find volume " + std::to_string(number), .reason = "it is not mounted", .status = exit_not_found};
 }
 
+const ArgumentKind volume_kind = {
+    .name = "volume",
+    .allowed = "a number from 1 on",
+    .valid = [](const std::string &number) { return VolumeNumber(std::string(prefix) + number) > 0; },
+    .sample = "9998",
+    .wrong = "one",
+};
+
 MountedVolume FindVolume(const std::string &number)
 {
-    const int value = VolumeNumber(std::string(prefix) + number);
-    if (value <= 0)
-        throw UsageFailure("find volume " + number, "it is no number of a volume");
-    return FindVolume(value);
+    return FindVolume(VolumeNumber(std::string(prefix) + number));
 }
 
 }  // namespace tavoctl

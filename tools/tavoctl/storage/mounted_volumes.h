@@ -2,6 +2,8 @@
 #ifndef TAVOCTL_MOUNTED_VOLUMES_H
 #define TAVOCTL_MOUNTED_VOLUMES_H
 
+#include "frame/argument_kind.h"
+
 #include <string>
 #include <vector>
 
@@ -16,6 +18,8 @@ struct MountedVolume {
 std::vector<MountedVolume> MountedVolumes();  // by number
 MountedVolume FindVolume(int number);         // throws a Failure when it is not mounted
 MountedVolume FindVolume(const std::string &number);
+
+extern const ArgumentKind volume_kind;  // the number of one
 
 }  // namespace tavoctl
 

@@ -1,0 +1,204 @@
+// tavoctl user: many accounts at once, from and to files.
+#include "account/user_verbs.h"
+#include "frame/password.h"
+
+#include <algorithm>
+#include <fstream>
+#include <map>
+#include <sstream>
+
+namespace tavoctl {
+namespace {
+
+struct SambaHashes {
+    std::string lm, nt;
+};
+
+// Samba's two hashes of every account that has some, by the key of its name.
+std::map<std::string, SambaHashes> ReadSambaHashes()
+{
+    std::map<std::string, SambaHashes> found;
+    std::ifstream in("/usr/tavo/etc/private/smbpasswd");
+    for (std::string line; std::getline(in, line);) {
+        std::istringstream fields(line);
+        std::string name, uid, lm, nt;
+        if (std::getline(fields, name, ':') && std::getline(fields, uid, ':') && std::getline(fields, lm, ':') &&
+            std::getline(fields, nt, ':') && lm.find('X') == std::string::npos)
+            found[AccountKey(name)] = {lm, nt};
+    }
+    return found;
+}
+
+struct GivenHashes {
+    std::string name, password, lm, nt;
+};
+
+// What a list asks for.
+struct UserPlan {
+    std::vector<UserChange> changes;
+    std::vector<GivenHashes> hashes;
+    int additions = 0;
+};
+
+// What the row says goes into the user; an empty value says nothing, except of free texts.
+void ApplyRow(const AccountRow &row, User &user)
+{
+    const auto given = [&](const char *column) -> const std::string * {
+        const std::string *value = row.Find(column);
+        return value && !value->empty() ? value : nullptr;
+    };
+    const auto set = [](const std::string *value, std::string &into) {
+        if (value)
+            into = *value;
+    };
+    set(given("name"), user.name);
+    set(row.Find("description"), user.description);
+    set(row.Find("mail"), user.mail);
+    set(given("home"), user.home);
+    set(given("shell"), user.shell);
+    user.uid = ImportedRows<UserKind>::IdIn(row, "uid").value_or(user.uid);
+    user.gid = ImportedRows<UserKind>::IdIn(row, "gid").value_or(user.gid);
+    if (const std::string *mask = given("privilege"))
+        user.privilege = ParsePrivilege(*mask);
+    if (const std::string *date = given("expires"))
+        user.expires = ParseExpiry(*date);
+    if (const std::string *flag = given("cannot_change_password")) {
+        if (*flag != "yes" && *flag != "no")
+            throw UsageFailure("take " + *flag + " as cannot_change_password", "allowed: yes, no");
+        user.cannot_change_password = *flag == "yes";
+    }
+}
+
+// The password of a row, or its hashes, or what the options say. True when it is going to be another one.
+bool ChoosePassword(const AccountRow &row, const PasswordChoice &choice, const std::string &attempted,
+                    UserChange &change, std::vector<GivenHashes> &hashes)
+{
+    const auto value = [&](const char *column) {
+        const std::string *text = row.Find(column);
+        return text ? *text : std::string();
+    };
+    const GivenHashes given = {change.user.name, value("password_hash"), value("lm_hash"), value("nt_hash")};
+    const std::string password = value("password");
+    const bool hashed = !given.password.empty() && !given.lm.empty() && !given.nt.empty();
+    if (!hashed && !(given.password + given.lm + given.nt).empty())
+        throw UsageFailure(attempted, "of the three hashes some are missing");
+    if (hashed && !password.empty())
+        throw UsageFailure(attempted, "it has a password and hashes of one");
+    const bool differs = hashed && change.user.password != given.password;
+    if (!password.empty())
+        change.user.password = password;
+    else if (hashed && !change.old_name)
+        change.user.password = UnknownPassword();  // for the moment until the hashes are stored
+    else if (!change.old_name && choice.IsMade())
+        change.user.password = choice.For(change.user.name);
+    else if (!change.old_name)
+        throw UsageFailure(attempted, "it has no password", "say --unknown-password or --empty-password");
+    if (differs || (hashed && !change.old_name))
+        hashes.push_back(given);
+    return differs || !password.empty() || !change.old_name;
+}
+
+void StoreHashes(const std::vector<GivenHashes> &hashes, const std::string &attempted)
+{
+    std::vector<User> users;
+    for (const GivenHashes &hash : hashes)
+        users.emplace_back().name = hash.name;
+    std::vector<TAVOUSER> records;
+    for (const User &user : users)
+        records.push_back(user.Record());
+    std::vector<const TAVOUSER *> rows;
+    std::vector<const char *> password, lm, nt;
+    for (std::size_t i = 0; i < hashes.size(); ++i) {
+        rows.push_back(&records[i]);
+        password.push_back(hashes[i].password.c_str());
+        lm.push_back(hashes[i].lm.c_str());
+        nt.push_back(hashes[i].nt.c_str());
+    }
+    const int count = static_cast<int>(rows.size());
+    TLIBErrSet(ERR_SUCCESS);
+    const int result = count ? TAVOUserSetPasswd(rows.data(), password.data(), lm.data(), nt.data(), count) : 0;
+    Failure failure = LibraryFailure(attempted);
+    if (result != 0)
+        throw failure;
+    for (const GivenHashes &hash : hashes)
+        if (ReadUser(hash.name).password != hash.password) {
+            failure.reason = "those of " + hash.name + " were refused";
+            throw failure;
+        }
+}
+
+}  // namespace
+
+Action UserExport(Arguments &in)
+{
+    const auto hashes = in.Flag("--hashes", "with the hashes of the passwords");
+    const auto path = in.Option("--output", "PATH", file_path, "a new file that only root can read (standard output)");
+    return [=](Call &call) {
+        const auto samba = *hashes ? ReadSambaHashes() : std::map<std::string, SambaHashes>();
+        std::vector<ColumnFacts> columns = Facts(user_export_columns);
+        std::erase_if(columns, [&](const ColumnFacts &column) { return column.place == in_one && !*hashes; });
+        for (ColumnFacts &column : columns)
+            column.place = in_list;
+        Table table(columns);
+        for (const User &user : UserKind::All({}, {})) {
+            ExportedUser exported = {user, {}, {}, {}};
+            const auto found = samba.find(AccountKey(user.name));
+            if (found != samba.end() && user.password.starts_with('$'))
+                exported = {user, user.password, found->second.lm, found->second.nt};
+            std::vector<Cell> row;
+            for (std::size_t i = 0; i < columns.size(); ++i)
+                row.push_back(user_export_columns[i].read(exported));
+            table.Add(std::move(row));
+        }
+        Export(call, table, *path);
+    };
+}
+
+Action UserImport(Arguments &in)
+{
+    const auto path = in.Text("FILE", file_path, "the list, or - for standard input");
+    const auto update = in.Flag("--update", "change accounts that are there, in place of refusing the list");
+    const PasswordChoice password(in);
+    return [=](Call &call) {
+        std::vector<std::string> columns = Names(user_export_columns);
+        columns.emplace_back("password");
+        ImportedRows<UserKind> rows(*path, *update);
+        UserPlan plan;
+        for (const AccountRow &row : ParseAccountRows(ReadWhole(*path), columns)) {
+            const std::optional<User> old = rows.Present(row);
+            UserChange change = {.old_name = {}, .user = old.value_or(User{})};
+            if (old)
+                change.old_name = old->name;
+            else
+                ++plan.additions;
+            ApplyRow(row, change.user);
+            if (const int uid = change.user.uid; uid >= 0 && !(old && old->uid == uid))
+                rows.TakeId(row, uid);
+            User described = change.user;
+            const bool differs = ChoosePassword(row, password, rows.Attempted(row), change, plan.hashes);
+            const std::string object = "user " + change.user.name;
+            const std::size_t before = call.report.changes.size();
+            described.password = old ? old->password : change.user.password;
+            call.Compare(object, user_columns, old, std::optional(described));
+            if (old && differs)
+                call.Change(object, "password", PasswordState(old->password), "new");
+            if (call.report.changes.size() > before)
+                plan.changes.push_back(std::move(change));
+        }
+        RefuseTooMany(plan.additions, "import " + *path);
+        if (!call.Proceed())
+            return;
+        const int last = LastUserId();
+        SetUsers(plan.changes, "import " + *path);
+        StoreHashes(plan.hashes, "store the hashes of " + *path);
+        for (const UserChange &change : plan.changes) {
+            if (change.old_name)
+                continue;
+            WarnOfName(change.user.name);
+            if (change.user.uid < 0)
+                WarnOfReusedId(change.user.name, ReadUser(change.user.name).uid, last);
+        }
+    };
+}
+
+}  // namespace tavoctl
