@@ -95,6 +95,10 @@ TAVO_API int ErrTLIBSubnetToIpMask(char *szIn, char *szOut);
  * ERR_BAD_PARAMETERS before anything is read or run. Settings stand in /etc/sysconfig/network-scripts/ifcfg-NAME and
  * /etc/sysconfig/network; changes hold the network lock (0x106, waiting at most 5 s; ERR_LOCK_FAILED) from beginning to
  * end and are made by /sbin/ifconfig, /sbin/route, /sbin/dhcpcd and /etc/rc.network.
+ *
+ * A change is all or nothing, also when the process dies in the middle of it: until it is over, /etc/network.undo has what
+ * puts the network back, and the next function that changes the network, or TAVONetHostsRefresh, does that first. After a
+ * restart of the system only the files are put back. A command that the dead process has left is ended.
  */
 
 /* Reads the first wired interface, from its file and the kernel (/sys/class/net). Returns 0 (with empty addresses when
@@ -141,8 +145,9 @@ TAVO_API int TAVOLnxSetHostname(const char *szName);
 
 /* Rewrites the line of /etc/hosts that names the appliance where it is not true any more: the host name (the kernel's
  * where none is stored) at the address of the first wired interface that has one, or at 127.0.1.1. Functions that change
- * an address do that themselves; this one is for the hook of the DHCP client. It never waits: while somebody holds the
- * network lock it does nothing, and the holder rewrites the file when it is done.
+ * an address do that themselves; this one is for the hook of the DHCP client and for the start of the network, because it
+ * finishes a change that was cut off. It never waits: while somebody holds the network lock it does nothing, and the holder
+ * rewrites the file when it is done.
  * Returns 0 (the file is true), 1 (left to the holder of the lock), or -1 with ERR_CREATE_FAILED or ERR_OPEN_FAILED (of
  * the lock files) or a code of the settings files. */
 TAVO_API int TAVONetHostsRefresh(void);

@@ -8,7 +8,6 @@
 #include "network/detail/route_change.h"
 
 #include <algorithm>
-#include <ranges>
 
 #include <net/route.h>
 
@@ -51,16 +50,6 @@ void RepairDefault(const std::vector<Route> &routes, const std::string &card, bo
         AddDefault(*stored);
 }
 
-void AddRoute(const Route &route)
-{
-    if (route.IsDefault() && route.metric == 0)
-        return AddDefault(route.gateway);
-    const std::string via = route.flags & RTF_GATEWAY ? " gw " + route.gateway.Text() : "";
-    const std::string metric = route.metric != 0 ? " metric " + std::to_string(route.metric) : "";
-    RunNetCommand("/sbin/route add -net %s netmask %s%s%s dev %s > /dev/null 2>&1", route.destination.Text(),
-                  route.mask.Text(), ComposedPiece{via}, ComposedPiece{metric}, route.interface);
-}
-
 }  // namespace
 
 std::vector<Route> LiveRoutes()
@@ -79,21 +68,26 @@ void RepairRoutes(const std::string &interface, bool dhcp)
     RepairDefault(routes, first, first == interface ? dhcp : ReadSetting(InterfaceFile(first), "BOOTPROTO") == "dhcp");
 }
 
-void PutBackRoutes(const std::vector<Route> &before, const std::vector<Route> &now, const std::string &interface)
+void RepairRoutes()
 {
-    const auto own = AddressOf(interface);
-    const auto is_own_network = [&](const Route &route) {
-        return own && !(route.flags & RTF_GATEWAY) && route.mask.Word() == own->mask.Word() &&
-               route.destination.Word() == (own->address.Word() & own->mask.Word());
-    };
-    // Networks on the link first, a router may be on one. From the last one on: a new route goes before its equals.
-    for (const uint32_t through_router : {0u, uint32_t{RTF_GATEWAY}}) {
-        for (const Route &route : std::views::reverse(before)) {
-            if (route.interface == interface && (route.flags & RTF_GATEWAY) == through_router &&
-                !is_own_network(route) && std::find(now.begin(), now.end(), route) == now.end())
-                AddRoute(route);
-        }
-    }
+    RepairRoutes("", false);
+}
+
+std::string RouteCommand(const Route &route)
+{
+    if (route.IsDefault() && route.metric == 0)
+        return ShellCommand("/sbin/route add default gw %s > /dev/null 2>&1", route.gateway.Text()).value_or("");
+    const std::string via = route.flags & RTF_GATEWAY ? " gw " + route.gateway.Text() : "";
+    const std::string metric = route.metric != 0 ? " metric " + std::to_string(route.metric) : "";
+    return ShellCommand("/sbin/route add -net %s netmask %s%s%s dev %s > /dev/null 2>&1", route.destination.Text(),
+                        route.mask.Text(), ComposedPiece{via}, ComposedPiece{metric}, route.interface)
+        .value_or("");
+}
+
+std::string RouteText(const Route &route)
+{
+    return route.interface + " " + route.destination.Text() + " " + route.mask.Text() + " " + route.gateway.Text() +
+           " " + std::to_string(route.metric);
 }
 
 }  // namespace tavo

@@ -17,8 +17,14 @@ std::vector<Route> LiveRoutes();
 // where there is no default route and the lease names none. `dhcp` is the mode of `interface`, whatever its file says.
 void RepairRoutes(const std::string &interface, bool dhcp);
 
-// Adds the routes of the interface that `before` has and `now` has not, except the one to its own network.
-void PutBackRoutes(const std::vector<Route> &before, const std::vector<Route> &now, const std::string &interface);
+// The same with every mode as the files have it.
+void RepairRoutes();
+
+// "/sbin/route add ..." of a route as the kernel has it.
+std::string RouteCommand(const Route &route);
+
+// All of a route on one line, to compare it.
+std::string RouteText(const Route &route);
 
 }  // namespace tavo
 

@@ -1,12 +1,16 @@
 // The DHCP client of an interface: its files and its end.
 #include "network/detail/dhcp_client.h"
 
+#include "core/detail/log.h"
 #include "core/detail/pid_file.h"
 #include "core/detail/process_list.h"
 #include "network/detail/net_command.h"
 
 #include <cerrno>
 #include <csignal>
+#include <cstring>
+
+#include <unistd.h>
 
 namespace tavo {
 
@@ -43,6 +47,23 @@ bool HasDhcpClient(const std::string &interface)
 void StartDhcpClient(const std::string &interface)
 {
     RunNetCommand("/sbin/dhcpcd -n %s -t %d > /dev/null 2>&1 &", interface, kDhcpSeconds);
+}
+
+bool EndDhcpClient(const std::string &interface, Where where)
+{
+    constexpr int most_rounds = 30;
+    for (int round = 0; KillDhcpClient(interface) == ClientEnd::alive; ++round) {
+        if (round == most_rounds)
+            return false;
+        const auto pid = ReadPidFile(DhcpPidFile(interface).c_str());
+        LogErrorAt(where, "%s(%d) dhcpcd pid[%d] still exists, wait 1 second.", pid.value_or(0));
+        ::sleep(1);
+    }
+    if (RunNetCommand("/sbin/ifconfig %s 0.0.0.0 > /dev/null 2>&1", interface) != 0)
+        LogErrorAt(where, "%s:%d Initial setting interface [%s] error %s", interface, std::strerror(errno));
+    ::sleep(1);
+    ::unlink(DhcpPidFile(interface).c_str());
+    return true;
 }
 
 ClientEnd KillDhcpClient(const std::string &interface)

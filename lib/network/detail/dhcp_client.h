@@ -2,6 +2,8 @@
 #ifndef TAVO_NETWORK_DETAIL_DHCP_CLIENT_H
 #define TAVO_NETWORK_DETAIL_DHCP_CLIENT_H
 
+#include "core/detail/where.h"
+
 #include <string>
 
 namespace tavo {
@@ -15,6 +17,10 @@ enum class ClientEnd {
 
 // One attempt. A pid file that names no process, or somebody else's, names no client.
 ClientEnd KillDhcpClient(const std::string &interface);
+
+// Ends the client that runs, so that two never fight over one interface, and clears the address. False, with nothing
+// cleared, for a client that outlives 30 attempts, one a second: it hangs in the kernel.
+bool EndDhcpClient(const std::string &interface, Where where = Where());
 
 // Whether a client takes care of the interface.
 bool HasDhcpClient(const std::string &interface);

@@ -15,12 +15,6 @@ namespace {
 
 constexpr std::string_view kStem = "ifcfg-";
 
-bool SyncFolder(const char *path)
-{
-    const Fd fd = OpenFd(path, O_RDONLY | O_DIRECTORY);
-    return fd && SyncFd(fd.Get());
-}
-
 std::vector<std::string> InterfaceFiles()
 {
     std::vector<std::string> paths;
@@ -67,21 +61,6 @@ std::optional<std::vector<FileState>> ReadInterfaceFiles()
         files.push_back(std::move(*file));
     }
     return files;
-}
-
-bool PutBackInterfaceFiles(const std::vector<FileState> &files)
-{
-    bool done = true;
-    for (const FileState &file : files)
-        done = PutBack(file) == 0 && done;
-    for (const std::string &path : InterfaceFiles()) {
-        const bool was_there =
-            std::any_of(files.begin(), files.end(), [&](const FileState &file) { return file.path == path; });
-        if (!was_there)
-            done = ::unlink(path.c_str()) == 0 && done;
-    }
-    SyncFolder(kInterfaceFolder);
-    return done;
 }
 
 }  // namespace tavo

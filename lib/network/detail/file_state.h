@@ -25,9 +25,6 @@ int PutBack(const FileState &file);
 // All interface files and their saved copies.
 std::optional<std::vector<FileState>> ReadInterfaceFiles();
 
-// The same after the change: also removes interface files that were not there before. False when one cannot be put back.
-bool PutBackInterfaceFiles(const std::vector<FileState> &files);
-
 }  // namespace tavo
 
 #endif

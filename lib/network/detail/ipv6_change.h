@@ -1,7 +1,8 @@
-// Changes of IPv6 addresses: what all of them refuse, and the tool that makes them.
+// Changes of the IPv6 addresses of an interface.
 #ifndef TAVO_NETWORK_DETAIL_IPV6_CHANGE_H
 #define TAVO_NETWORK_DETAIL_IPV6_CHANGE_H
 
+#include "core/detail/where.h"
 #include "network/detail/ipv6_text.h"
 
 namespace tavo {
@@ -11,8 +12,11 @@ constexpr bool IsPrefixLength(int length) noexcept
     return length >= 0 && length <= kIpv6Bits;
 }
 
-// "/sbin/ip -6 addr VERB ADDRESS/LENGTH dev INTERFACE"; its exit status, -1 when it was not run.
-int RunAddressTool(const char *verb, const in6_addr &address, int length, const char *interface);
+enum class Ipv6AddressChange { add, remove };
+
+// The body of TAVONetIPv6AddrAdd and TAVONetIPv6AddrDel: what they refuse, the change in the kernel, and the interface file.
+int ChangeIpv6Address(Ipv6AddressChange change, const char *interface, const char *text, int length,
+                      Where where = Where()) noexcept;
 
 }  // namespace tavo
 

@@ -7,12 +7,15 @@
 
 namespace tavo {
 
+// Runs a composed command, and notes it for whoever has to finish the change if this process dies meanwhile. As RunCommand.
+int RunNetText(const std::string &command);
+
 // The exit status; -1 when the command could not be composed or run, or was killed.
 template <class... Args>
 int RunNetCommand(FormatFor<Args...> format, const Args &...args)
 {
     const auto command = ShellCommand(format, args...);
-    return command ? RunCommand(*command) : -1;
+    return command ? RunNetText(*command) : -1;
 }
 
 }  // namespace tavo

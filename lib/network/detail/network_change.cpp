@@ -3,6 +3,7 @@
 
 #include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
+#include "network/detail/checkpoint.h"
 
 #include <unistd.h>
 
@@ -13,6 +14,16 @@ void KeepHostsTrue(const Where &where)
 {
     if (UpdateHosts() != 0)
         LogErrorAt(where, "%s:%d Set %s error.", kHostsFile);
+}
+
+// Not a function that is a part of another one's change.
+bool IsOutermost()
+{
+    for (const TLIBLOCKFILE *entry = rgslckList; entry->fLockBit != 0; ++entry) {
+        if (entry->fLockBit == TAVO_LOCK_HOST)
+            return entry->nRef == 1;
+    }
+    return false;
 }
 
 }  // namespace
@@ -27,6 +38,16 @@ void KeepHostsTrueAfterwards(Where where)
         KeepHostsTrue(where);
 }
 
+int FinishAndKeepHostsTrue(Where where)
+{
+    if (IsOutermost())
+        FinishCutOffChange(where);
+    const int code = UpdateHosts();
+    if (code != 0)
+        LogErrorAt(where, "%s:%d Set %s error.", kHostsFile);
+    return code;
+}
+
 int ChangeNetwork(FunctionRef<int()> body, unsigned more_locks, Where where)
 {
     int result = -1;
@@ -34,6 +55,8 @@ int ChangeNetwork(FunctionRef<int()> body, unsigned more_locks, Where where)
         const LockHold lock(kNetworkExclusive | more_locks, kNetworkSeconds);
         if (!lock)
             return Fail(ERR_LOCK_FAILED, where);
+        if (IsOutermost())
+            FinishCutOffChange(where);
         result = body();
         KeepHostsTrue(where);
     }

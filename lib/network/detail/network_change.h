@@ -18,6 +18,10 @@ namespace tavo {
 // held. That it cannot be written is logged.
 void KeepHostsTrueAfterwards(Where where = Where());
 
+// For somebody who holds the lock and changes nothing himself: finishes what a process that died has left, and rewrites
+// /etc/hosts where it is not true. 0 or the code of the latter.
+int FinishAndKeepHostsTrue(Where where = Where());
+
 // Runs the body, which gives the result of the exported function, under the lock: with `more_locks` in one request.
 // -1 with ERR_LOCK_FAILED when the lock cannot be had.
 int ChangeNetwork(FunctionRef<int()> body, unsigned more_locks = 0, Where where = Where());

@@ -2,6 +2,7 @@
 #ifndef TAVO_NETWORK_DETAIL_ROUTE_CHANGE_H
 #define TAVO_NETWORK_DETAIL_ROUTE_CHANGE_H
 
+#include "core/detail/where.h"
 #include "network/detail/ipv4_text.h"
 #include "network/detail/ipv6_text.h"
 
@@ -28,6 +29,12 @@ std::optional<Ipv6Route> ParseRoute(const char *network, int length, const char 
 int RunRouteTool(const char *verb, const Ipv4Route &route, const char *interface);
 // "/sbin/ip -6 route VERB NETWORK/LENGTH [via GATEWAY] dev INTERFACE".
 int RunRouteTool(const char *verb, const Ipv6Route &route, const char *interface);
+
+// The bodies of the exported functions, with what they refuse. A route is one step of the kernel's, and stored nowhere.
+int ChangeIpv4Route(const char *verb, const char *network, const char *mask, const char *interface,
+                    Where where = Where()) noexcept;
+int ChangeIpv6Route(const char *verb, const char *interface, const char *network, int length, const char *gateway,
+                    Where where = Where()) noexcept;
 
 }  // namespace tavo
 

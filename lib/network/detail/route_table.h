@@ -21,7 +21,6 @@ struct Route {
     uint32_t metric = 0;  // the route with the least one is used
 
     bool IsDefault() const noexcept;
-    bool operator==(const Route &) const noexcept = default;
 };
 
 // Empty when the header line is not the one that this format has; rows that do not parse are left out.

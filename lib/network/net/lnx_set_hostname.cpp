@@ -4,8 +4,8 @@
 #include "tavo_file.h"
 
 #include "core/detail/guard.h"
-#include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
+#include "network/detail/checkpoint.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/network_change.h"
 
@@ -15,31 +15,27 @@
 
 namespace {
 
-void PutBackName(const std::string &stored, const char *refused)
-{
-    const tavo::KeepFault keep;
-    if (stored.empty())
-        TLIBFileRemoveKey(tavo::kNetworkFile, "HOSTNAME");
-    else
-        TLIBFileSetKeyValue(tavo::kNetworkFile, "HOSTNAME", stored.c_str(), nullptr);
-    tavo::UpdateHosts(refused);
-}
-
 int SetName(const char *name)
 {
-    const std::string stored = tavo::ReadSetting(tavo::kNetworkFile, "HOSTNAME");
     const std::string old_name = tavo::OwnHostName();
-    if (TLIBFileSetKeyValue(tavo::kNetworkFile, "HOSTNAME", name, nullptr) < 0)
-        return Fail(TLIBErrGet());
-    if (const int code = tavo::UpdateHosts(old_name)) {
-        LogError("%s:%d Set %s error.", tavo::kHostsFile);
-        PutBackName(stored, name);
+    tavo::Checkpoint before;
+    before.AddSetting(tavo::kNetworkFile, "HOSTNAME");
+    before.AddFile(tavo::kHostsFile);
+    before.AddHostName();
+    before.Begin();
+    int code = TLIBFileSetKeyValue(tavo::kNetworkFile, "HOSTNAME", name, nullptr) < 0 ? TLIBErrGet() : 0;
+    if (code == 0) {
+        code = tavo::UpdateHosts(old_name);
+        if (code != 0)
+            LogError("%s:%d Set %s error.", tavo::kHostsFile);
+    }
+    if (code == 0 && ::sethostname(name, std::strlen(name)) != 0)
+        code = ERR_SYS_UNKNOWN;
+    if (code != 0) {
+        before.PutBack();
         return Fail(code);
     }
-    if (::sethostname(name, std::strlen(name)) != 0) {
-        PutBackName(stored, name);
-        return Fail(ERR_SYS_UNKNOWN);
-    }
+    before.End();
     return 0;
 }
 

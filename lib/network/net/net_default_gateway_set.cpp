@@ -4,8 +4,8 @@
 #include "tavo_file.h"
 
 #include "core/detail/guard.h"
-#include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
+#include "network/detail/checkpoint.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/ipv4_text.h"
 #include "network/detail/net_command.h"
@@ -13,47 +13,25 @@
 
 namespace {
 
-int AddDefault(const std::string &gateway)
-{
-    return tavo::RunNetCommand("/sbin/route add default gw %s > /dev/null 2>&1", gateway);
-}
-
-// What the kernel and the file had before; without a route the appliance would be cut off from whoever sets it.
-void PutBackGateway(const std::string &live, const std::string &stored)
-{
-    if (!stored.empty())
-        TLIBFileSetKeyValue(tavo::kNetworkFile, "GATEWAY", stored.c_str(), nullptr);
-    else
-        TLIBFileRemoveKey(tavo::kNetworkFile, "GATEWAY");
-    if (!live.empty())
-        AddDefault(live);
-}
-
-std::string LiveGateway()
-{
-    const tavo::KeepFault keep;  // without one there is nothing to put back
-    char gateway[20] = "";
-    return TAVONetDefaultGatewayGet(gateway, sizeof gateway) == 0 ? gateway : "";
-}
-
 int SetGateway(const std::string &gateway)
 {
-    const std::string live = LiveGateway();
-    const std::string stored = tavo::ReadSetting(tavo::kNetworkFile, "GATEWAY");
-
+    tavo::Checkpoint before;
+    before.AddSetting(tavo::kNetworkFile, "GATEWAY");
+    before.AddGateway();
+    before.Begin();
     tavo::RunNetCommand("/sbin/route delete default > /dev/null 2>&1");
     if (TLIBFileSetKeyValue(tavo::kNetworkFile, "GATEWAY", gateway.c_str(), nullptr) < 0) {
         const int code = TLIBErrGet();
         LogError("%s(%d): TLIBFileSetKeyValue(%s, GATEWAY, %s) failed.(%X)", tavo::kNetworkFile, gateway, code);
-        if (!live.empty())
-            AddDefault(live);
+        before.PutBack();
         return Fail(code);
     }
-    if (AddDefault(gateway) != 0) {
+    if (tavo::RunNetCommand("/sbin/route add default gw %s > /dev/null 2>&1", gateway) != 0) {
         LogError("%s(%d): failed to set default gateway.");
-        PutBackGateway(live, stored);
+        before.PutBack();  // without a route the appliance would be cut off from whoever sets it
         return Fail(ERR_OP_FAILURE);
     }
+    before.End();
     return 0;
 }
 

@@ -4,6 +4,7 @@
 #include "core/detail/file_rewrite.h"
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
+#include "network/detail/checkpoint.h"
 #include "network/detail/ipv4_text.h"
 #include "network/detail/network_change.h"
 
@@ -37,10 +38,16 @@ void LogFailure(int code)
 
 int Write(const std::string &text)
 {
+    tavo::Checkpoint before;
+    before.AddFile(kResolver);
+    before.Begin();
     tavo::FileRewrite rewrite;
     int code = rewrite.Open(kResolver);
     if (code == 0 || rewrite.IsMissing())
         code = rewrite.Replace(text, 0644);
+    const int error = errno;
+    before.End();
+    errno = error;
     if (code == 0)
         return 0;
     LogFailure(code);

@@ -1,8 +1,8 @@
-// Brings /etc/hosts up to date after an address has changed: for the hook of the DHCP client.
+// Finishes a change that was cut off, and brings /etc/hosts up to date: for the start of the network and the hook of the
+// DHCP client.
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"
-#include "core/detail/log.h"
 #include "network/detail/network_change.h"
 
 extern "C" int TAVONetHostsRefresh(void)
@@ -12,9 +12,7 @@ extern "C" int TAVONetHostsRefresh(void)
         const tavo::LockHold lock(tavo::kNetworkExclusive, 0);
         if (!lock)
             return TLIBErrGet() == ERR_LOCK_FAILED ? 1 : Fail(TLIBErrGet());
-        const int code = tavo::UpdateHosts();
-        if (code != 0)
-            LogError("%s:%d Set %s error.", tavo::kHostsFile);
+        const int code = tavo::FinishAndKeepHostsTrue();
         return code == 0 ? 0 : Fail(code);
     });
 }

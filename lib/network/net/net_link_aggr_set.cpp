@@ -6,7 +6,7 @@
 #include "core/detail/log.h"
 #include "core/detail/text_fields.h"
 #include "network/detail/bond_files.h"
-#include "network/detail/file_state.h"
+#include "network/detail/checkpoint.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/interface_name.h"
 #include "network/detail/kernel_interface.h"
@@ -68,36 +68,50 @@ void AddPhysicalMembers(TAVONETLINKAGGR &aggr)
         TAVONetLinkAggrOptSlsaveAdd(&aggr, std::string(member).c_str());
 }
 
-// 0 or the code of what failed.
-int Rebuild(tavo::BondChange &change, const std::vector<tavo::FileState> &before)
+constexpr const char *kStop = "/etc/rc.network stop > /dev/null 2>&1";
+constexpr const char *kStart = "/etc/rc.network start > /dev/null 2>&1";
+
+// What there is before the change, and the files that it makes. False when it cannot be read.
+bool Snapshot(tavo::Checkpoint &before, const TAVONETLINKAGGR &aggr)
 {
-    tavo::RunNetCommand("/etc/rc.network stop > /dev/null 2>&1");
+    before.AddCommand(kStop);
+    bool read = before.AddInterfaceFiles() && before.AddFile(tavo::InterfaceFile(aggr.szBond));
+    for (int i = 0; i < aggr.nMember; ++i) {
+        const std::string file = tavo::InterfaceFile(aggr.rgszMember[i]);
+        read = read && before.AddFile(file) && before.AddFile(file + ".saved");
+    }
+    before.AddCommand(kStart);
+    before.AddGateway();
+    return read;
+}
+
+// 0 or the code of what failed.
+int Rebuild(tavo::BondChange &change, tavo::Checkpoint &before)
+{
+    before.Begin();
+    tavo::RunNetText(kStop);
     const bool written = change.Apply();
     if (!written)
-        tavo::PutBackInterfaceFiles(before);
-    const bool started = tavo::RunNetCommand("/etc/rc.network start > /dev/null 2>&1") == 0;
-    if (!written)
-        return ERR_WRITE_FAILED;
-    if (started)
-        return 0;
+        before.PutBackFiles();
+    const bool started = tavo::RunNetText(kStart) == 0;
     // The network that worked before is worth more than half of a new one.
-    tavo::RunNetCommand("/etc/rc.network stop > /dev/null 2>&1");
-    tavo::PutBackInterfaceFiles(before);
-    tavo::RunNetCommand("/etc/rc.network start > /dev/null 2>&1");
-    return ERR_OP_FAILURE;
+    if (written && !started)
+        before.PutBack();
+    before.End();
+    return !written ? ERR_WRITE_FAILED : started ? 0 : ERR_OP_FAILURE;
 }
 
 int Set(TAVONETLINKAGGR aggr)
 {
     if (aggr.nMode == TAVO_NET_AGGR_NONE && aggr.fSlaveOption == 0)
         AddPhysicalMembers(aggr);
-    const std::vector<std::string> members(aggr.rgszMember, aggr.rgszMember + aggr.nMember);
-    const auto before = tavo::ReadInterfaceFiles();
-    if (!before)
+    tavo::Checkpoint before;
+    if (!Snapshot(before, aggr))
         return Fail(ERR_READ_FAILED);
+    const std::vector<std::string> members(aggr.rgszMember, aggr.rgszMember + aggr.nMember);
     tavo::BondChange change;
     const bool prepared = change.Prepare(aggr.szBond, static_cast<tavo::BondMode>(aggr.nMode), members);
-    const int code = prepared ? Rebuild(change, *before) : ERR_WRITE_FAILED;
+    const int code = prepared ? Rebuild(change, before) : ERR_WRITE_FAILED;
     if (code == ERR_WRITE_FAILED)
         LogError("%s:%d Set %s error.", tavo::InterfaceFile(aggr.szBond));
     return code == 0 ? 0 : Fail(code);

@@ -2,11 +2,9 @@
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"
-#include "core/detail/keep_fault.h"
+#include "network/detail/checkpoint.h"
 #include "network/detail/interface_name.h"
-#include "network/detail/kernel_interface.h"
 #include "network/detail/mtu_setting.h"
-#include "network/detail/net_command.h"
 #include "network/detail/network_change.h"
 
 namespace {
@@ -14,14 +12,16 @@ namespace {
 // One that the card refuses is not stored: the next start would fail on it, too.
 int SetBoth(const char *interface, int mtu)
 {
-    const std::string before = tavo::InterfaceAttribute(interface, "mtu");
-    if (TAVONetSetMTUEth(interface, mtu) != 0)
-        return -1;
-    if (TAVOConfSetMTUValue(interface, mtu) == 0)
-        return 0;
-    if (!before.empty())
-        tavo::RunNetCommand("/sbin/ifconfig %s mtu %s > /dev/null 2>&1", interface, before);
-    return -1;
+    tavo::Checkpoint before;
+    before.AddMtu(interface);
+    before.AddSetting("/etc/tavoinfo.conf", tavo::MtuKey(interface).text);
+    before.Begin();
+    const bool set = TAVONetSetMTUEth(interface, mtu) == 0;
+    const bool stored = set && TAVOConfSetMTUValue(interface, mtu) == 0;
+    if (set && !stored)
+        before.PutBack();
+    before.End();
+    return stored ? 0 : -1;
 }
 
 }  // namespace

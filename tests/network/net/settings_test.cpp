@@ -181,7 +181,7 @@ TEST_F(NetSettings, AClientThatEndedForNothingIsStartedAgain)
     EXPECT_THAT(commands_.Commands(),
                 ElementsAre(Quiet("/sbin/ifconfig eth0 0.0.0.0"), HasSubstr("192.0.2.20"),
                             Quiet("/sbin/ifconfig eth0 192.0.2.77 netmask 255.255.255.0 broadcast 192.0.2.255"),
-                            Quiet("/sbin/route add default gw 192.0.2.3"), Quiet("/sbin/dhcpcd -n eth0 -t 30") + " &"));
+                            Quiet("/sbin/dhcpcd -n eth0 -t 30") + " &", Quiet("/sbin/route add default gw 192.0.2.3")));
     EXPECT_EQ(client.End(), SIGKILL);
     std::filesystem::remove("/etc/dhcpc/dhcpcd-eth0.info");
 }

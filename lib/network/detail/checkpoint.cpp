@@ -1,0 +1,254 @@
+// The network as it was before a change: its record, and how it is put back.
+#include "network/detail/checkpoint.h"
+
+#include "core/detail/keep_fault.h"
+#include "core/detail/lock_hold.h"
+#include "core/detail/log.h"
+#include "core/detail/process_list.h"
+#include "core/detail/run_command.h"
+#include "core/detail/text_fields.h"
+#include "network/detail/connected_route.h"
+#include "network/detail/dhcp_client.h"
+#include "network/detail/file_state.h"
+#include "network/detail/kernel_interface.h"
+#include "tavo_file.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <charconv>
+#include <csignal>
+#include <cstdio>
+#include <cstring>
+
+namespace tavo {
+namespace {
+
+constexpr const char *kRecord = "/etc/network.undo";
+constexpr const char *kSystemSettings = "/etc/tavoinfo.conf";
+
+constinit int noted_in = -1;  // the record of the change that this process makes
+
+std::string BootId()
+{
+    return ReadKernelFile("/proc/sys/kernel/random/boot_id").value_or("unknown\n");
+}
+
+// The first line of the record: the command in progress, its process once it has one. It is written over, so its length is
+// fixed.
+constexpr size_t kLongestCommand = 300;
+
+std::string CommandLine(pid_t pid, std::string_view command)
+{
+    const std::string beginning = pid > 0 ? BeginningOf(pid) : "-";
+    const std::string text(command.substr(0, std::min(command.find(" >"), kLongestCommand)));
+    char line[400];
+    std::snprintf(line, sizeof line, "command %10d %20s %-*s\n", static_cast<int>(pid), beginning.c_str(),
+                  static_cast<int>(kLongestCommand), text.c_str());
+    return line;
+}
+
+void KillProcess(pid_t pid, std::string_view beginning)
+{
+    if (pid <= 0 || beginning.empty() || BeginningOf(pid) != beginning)
+        return;
+    ::kill(pid, SIGKILL);
+    constexpr int rounds = 100;
+    for (int i = 0; i < rounds && BeginningOf(pid) == beginning && !IsZombie(pid); ++i)
+        ::usleep(10000);
+}
+
+pid_t ToPid(std::string_view text)
+{
+    pid_t pid = 0;
+    std::from_chars(text.data(), text.data() + text.size(), pid);
+    return pid;
+}
+
+// The process is noted when it runs, and its parent may have died just before; so the text counts, too.
+void KillCommand(std::string_view line)
+{
+    const auto field = SplitFields(line);
+    if (field.size() < 3 || field[0] != "command")
+        return;
+    KillProcess(ToPid(field[1]), field[2]);
+    if (field.size() == 3)
+        return;
+    std::string_view text = line.substr(static_cast<size_t>(field[3].data() - line.data()));
+    text = text.substr(0, text.find_last_not_of(' ') + 1);
+    for (const Process &process : ListProcesses()) {
+        if (process.pid != ::getpid() && process.command.find(text) != std::string::npos)
+            KillProcess(process.pid, BeginningOf(process.pid));
+    }
+}
+
+void EndClients(const UndoStep &step)
+{
+    for (const Process &process : ListProcesses()) {
+        const auto words = SplitFields(process.command);
+        if (words.empty() || !words[0].substr(words[0].rfind('/') + 1).starts_with("dhcpcd") ||
+            std::find(words.begin() + 1, words.end(), step.target) == words.end())
+            continue;
+        const std::string beginning = BeginningOf(process.pid);
+        if (process.pid != ToPid(step.value) || beginning != step.more)
+            KillProcess(process.pid, beginning);
+    }
+}
+
+void PutBackSetting(const UndoStep &step)
+{
+    const KeepFault keep;
+    const bool shared = step.target == kSystemSettings;
+    const LockHold lock(shared ? TAVO_LOCK_TAVOINFO | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING : TAVO_LOCK_EXCLUSIVE,
+                        5);
+    if (step.kind == UndoStep::setting)
+        TLIBFileSetKeyValue(step.target.c_str(), step.more.c_str(), step.value.c_str(), nullptr);
+    else
+        TLIBFileRemoveKey(step.target.c_str(), step.more.c_str());
+}
+
+mode_t ToMode(const std::string &text)
+{
+    mode_t mode = 0644;
+    std::from_chars(text.data(), text.data() + text.size(), mode, 8);
+    return mode;
+}
+
+bool IsLive(const std::string &route)
+{
+    const auto live = LiveRoutes();
+    return std::any_of(live.begin(), live.end(), [&](const Route &one) { return RouteText(one) == route; });
+}
+
+// False when an address could not be set.
+bool Do(const UndoStep &step, bool cleared)
+{
+    switch (step.kind) {
+    case UndoStep::file:
+        PutBack(FileState{step.target, step.value, ToMode(step.more)});
+        return true;
+    case UndoStep::no_file:
+        PutBack(FileState{step.target, std::nullopt, 0});
+        return true;
+    case UndoStep::setting:
+    case UndoStep::no_setting:
+        PutBackSetting(step);
+        return true;
+    case UndoStep::host_name:
+        (void)!::sethostname(step.target.c_str(), step.target.size());
+        return true;
+    case UndoStep::command:
+        RunCommandQuietly(step.target);
+        return true;
+    case UndoStep::address:
+        return RunCommandQuietly(step.target) == 0;
+    case UndoStep::route:
+        if (cleared || !IsLive(step.value))
+            RunCommandQuietly(step.target);
+        return true;
+    case UndoStep::end_clients:
+        EndClients(step);
+        return true;
+    case UndoStep::client:
+        if (!HasDhcpClient(step.target))
+            StartDhcpClient(step.target);
+        return true;
+    }
+    return true;
+}
+
+}  // namespace
+
+std::string BeginningOf(pid_t pid)
+{
+    const std::string stat = ReadKernelFile(("/proc/" + std::to_string(pid) + "/stat").c_str()).value_or("");
+    const auto field = SplitFields(std::string_view(stat).substr(std::min(stat.rfind(')') + 1, stat.size())));
+    constexpr size_t start_time = 19;  // after the name
+    return field.size() > start_time ? std::string(field[start_time]) : "";
+}
+
+Checkpoint::~Checkpoint()
+{
+    if (record_)
+        noted_in = -1;
+}
+
+void Checkpoint::Begin(Where where)
+{
+    if (noted_in >= 0 || ::geteuid() != 0)
+        return;  // a part of a larger change, or of none that could come to pass
+    const std::string text = CommandLine(0, "") + "boot " + BootId() + UndoText(steps_);
+    // Its end says that it is whole: what was cut off before that is not a change yet.
+    ::unlink(kRecord);
+    record_ = OpenFd(kRecord, O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
+    if (record_ && WriteAll(record_.Get(), text) && SyncFd(record_.Get())) {
+        const Fd folder = OpenFd("/etc", O_RDONLY | O_DIRECTORY);
+        if (folder)
+            SyncFd(folder.Get());
+        noted_in = record_.Get();
+        return;
+    }
+    LogErrorAt(where, "%s:%d Fail to write [%s], errno=[%d/%s]", kRecord, errno, std::strerror(errno));
+    ::unlink(kRecord);
+    record_.Reset();
+}
+
+void Checkpoint::End()
+{
+    if (!record_)
+        return;
+    noted_in = -1;
+    record_.Reset();
+    ::unlink(kRecord);
+}
+
+bool Checkpoint::PutBack(bool cleared)
+{
+    bool done = true;
+    for (const UndoStep &step : steps_)
+        done = (step.after_death || Do(step, cleared)) && done;
+    End();
+    return done;
+}
+
+void Checkpoint::PutBackFiles()
+{
+    for (const UndoStep &step : steps_) {
+        if (step.IsOfFiles())
+            Do(step, false);
+    }
+}
+
+void Checkpoint::NoteCommand(pid_t pid, std::string_view command)
+{
+    if (noted_in < 0)
+        return;
+    const std::string line = CommandLine(pid, command);
+    (void)!::pwrite(noted_in, line.data(), line.size(), 0);
+}
+
+void FinishCutOffChange(Where where)
+{
+    const auto text = ReadKernelFile(kRecord);
+    if (!text)
+        return;
+    std::string_view rest = *text;
+    const std::string_view command = TakeLine(rest);
+    const std::string_view boot = rest.substr(0, rest.find('\n') + 1);
+    rest.remove_prefix(boot.size());
+    const auto steps = ParseUndo(rest);
+    if (steps) {
+        LogErrorAt(where, "%s:%d A change of the network was cut off. What it has changed is put back.");
+        const bool same_boot = boot == "boot " + BootId();
+        if (same_boot)
+            KillCommand(command);
+        for (const UndoStep &step : *steps) {
+            if (same_boot || step.IsOfFiles())
+                Do(step, true);
+        }
+        if (same_boot)
+            RepairRoutes();
+    }
+    ::unlink(kRecord);
+}
+
+}  // namespace tavo

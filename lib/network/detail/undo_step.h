@@ -1,0 +1,44 @@
+// What puts a piece of the network back, as data: it goes into a file that a later process may have to work through.
+#ifndef TAVO_NETWORK_DETAIL_UNDO_STEP_H
+#define TAVO_NETWORK_DETAIL_UNDO_STEP_H
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace tavo {
+
+struct UndoStep {
+    enum Kind : char {
+        file = 'f',        // `target` has the text `value`, and the mode `more` in octal
+        no_file = 'F',     // `target` is not there
+        setting = 's',     // the key `more` of `target` has that value
+        no_setting = 'S',  // `target` has no such key
+        host_name = 'h',   // the kernel's name is `target`
+        command = 'c',     // `target` is run
+        address = 'a',     // the same; a failure is reported
+        route = 'r',       // the same; `value` is the route, as RouteText writes it
+        end_clients =
+            'e',       // DHCP clients of the interface `target` end, except the process `value` that began at `more`
+        client = 'd',  // the interface `target` has a DHCP client
+    };
+
+    Kind kind;
+    std::string target;
+    std::string value;
+    std::string more;
+    bool after_death = false;  // only needed when nobody knows how far the change came
+
+    bool IsOfFiles() const { return kind == file || kind == no_file || kind == setting || kind == no_setting; }
+    bool operator==(const UndoStep &) const = default;
+};
+
+std::string UndoText(const std::vector<UndoStep> &steps);
+
+// Empty when the text is not all of what UndoText wrote.
+std::optional<std::vector<UndoStep>> ParseUndo(std::string_view text);
+
+}  // namespace tavo
+
+#endif
