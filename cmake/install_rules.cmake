@@ -3,6 +3,7 @@
 #   development  headers, and what pkg-config and find_package need
 #   tavoctl      the command-line program with its man page and completion
 #   appliance    the discovery daemon and the partitioning tool, which only an appliance runs
+#   documentation, python   the reference and the Python module, where they are built (python/CMakeLists.txt)
 # The archive of the same objects is for the tests: a program that linked it would have to bring the C++ runtime and every
 # dependency along, and would keep the faults that an update of the library mends.
 include(CMakePackageConfigHelpers)

@@ -169,7 +169,7 @@ extern TAVO_API const char *const rgszErrMsg[145];
 /* The number of entries of rgszErrMsg: 145. */
 extern TAVO_API const int32_t errNum;
 
-/* 96. Nothing in the library reads it. */
+/* Always 96; nothing in the library reads it. */
 extern TAVO_API const int32_t codeNum;
 
 /* A second error cell, the volume module's alone; independent of tavoerrno. */

@@ -115,7 +115,7 @@ TAVO_API const char *TAVOServiceProcGet(int id);
 /* The daemon mask of a service; -1 for a bad id. */
 TAVO_API int TAVOServiceDaemonIDGet(int id);
 
-/* The data folders of a service, ended by TAVO_SERVICE_SHARE_END. */
+/* The ids of the data folders of a service, ended by TAVO_SERVICE_SHARE_END. */
 TAVO_API const int32_t *TAVOServiceShareIDGet(int id);
 
 /* How a service is driven: 0 bound to data folders (and always the printer, id 9), 1 by its script, 2 by its key alone,

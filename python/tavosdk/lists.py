@@ -1,0 +1,110 @@
+"""String lists: the library's own kind of list, for calls under their C names. Other modules return Python lists."""
+from __future__ import annotations
+
+from collections.abc import Iterable, Iterator, MutableSequence
+from typing import Any
+
+from ._core import c_names, call, ffi, lib, quietly, text, to_c, wraps
+
+__all__ = ["StringList"]
+__getattr__, __dir__ = c_names("list", globals())
+
+
+class StringList(MutableSequence[str]):
+    """A list of texts in the library's memory, which this object frees. `cell` is what functions take that may move it
+    (TLIBSZLIST **), `pointer` what the others take. A list that was closed is empty and refuses changes."""
+
+    def __init__(self, items: Iterable[str] = (), size: int = 512):
+        self.cell = ffi.new("TLIBSZLIST **", call("PslTLIBSzListAlloc", size))
+        self.extend(items)
+
+    @property
+    def pointer(self) -> Any:
+        if not self.open:
+            raise ValueError("the list was closed")
+        return self.cell[0]
+
+    @property
+    def open(self) -> bool:
+        return getattr(self, "cell", None) is not None and self.cell[0] != ffi.NULL
+
+    def close(self) -> None:
+        if self.open:
+            lib.TLIBSzListFree(self.cell[0])
+            self.cell[0] = ffi.NULL
+
+    __del__ = close
+
+    def __enter__(self) -> StringList:
+        return self
+
+    def __exit__(self, *_: object) -> None:
+        self.close()
+
+    def __len__(self) -> int:
+        return self.pointer.nItem if self.open else 0
+
+    def _index(self, index: int) -> int:
+        place = index + len(self) if index < 0 else index
+        if not 0 <= place < len(self):
+            raise IndexError("list index out of range")
+        return place
+
+    def __getitem__(self, index: Any) -> Any:
+        if isinstance(index, slice):
+            return [self[place] for place in range(*index.indices(len(self)))]
+        return text(lib.SzTLIBSzListGet(self.pointer, self._index(index)))
+
+    def __setitem__(self, index: Any, value: Any) -> None:
+        call("TLIBSzListSet", self.cell, self._index(index), value)
+
+    def __delitem__(self, index: Any) -> None:
+        lib.SzTLIBSzListRemove(self.pointer, self._index(index))
+
+    @wraps("TLIBSzListInsert")
+    def insert(self, index: int, value: str) -> None:
+        """Inserts before index; a sorted list has a place of its own for it."""
+        count = len(self)
+        index = max(index + count, 0) if index < 0 else min(index, count)
+        call("TLIBSzListInsert", self._open_cell(), index, value)
+
+    def _open_cell(self) -> Any:
+        assert self.pointer is not None
+        return self.cell
+
+    @wraps("TLIBSzListSortItems")
+    def sort(self, ignore_case: bool = False) -> None:
+        lib.TLIBSzListSortItems(self.pointer, lib.TLIB_SZLIST_CASESORTED if ignore_case else lib.TLIB_SZLIST_SORTED)
+
+    @wraps("TLIBSzListFind", "TLIBSzListCaseFind")
+    def find(self, value: str, ignore_case: bool = False) -> int:
+        """The index of the text, -1 without one."""
+        function = "TLIBSzListCaseFind" if ignore_case else "TLIBSzListFind"
+        found, error = quietly(function, self.pointer, value)
+        if error:
+            raise error
+        return found
+
+    def __contains__(self, value: object) -> bool:
+        return isinstance(value, str) and any(item == value for item in self)
+
+    def __iter__(self) -> Iterator[str]:
+        place = 0
+        while place < len(self):
+            yield self[place]
+            place += 1
+
+    def __eq__(self, other: object) -> bool:
+        return isinstance(other, (list, StringList)) and list(self) == list(other)
+
+    def __repr__(self) -> str:
+        return f"StringList({list(self)!r})" if self.open else "<closed StringList>"
+
+
+def taken(function: str, *arguments: Any, place: int | None = None) -> list[str]:
+    """The texts that a function appends to a list; `place` is where it takes the list among its arguments."""
+    with StringList() as into:
+        given = list(arguments)
+        given.insert(len(given) if place is None else place, into.cell)
+        call(function, *[to_c(argument) for argument in given])
+        return list(into)

@@ -1,0 +1,137 @@
+"""Local user accounts. Changing needs root; the functions take the locks that they need."""
+from __future__ import annotations
+
+import dataclasses
+import datetime
+
+from ._core import Error, Texts, c_names, call, ffi, lib, quietly, text, to_c, wraps
+from .lists import taken
+
+__getattr__, __dir__ = c_names("user", globals())
+
+_EPOCH = datetime.date(1970, 1, 1)
+
+
+@dataclasses.dataclass
+class User:
+    name: str
+    uid: int = -1                   #: -1 when handed in: choose one, or keep it
+    gid: int = -1                   #: primary group; -1 when handed in: 100
+    description: str = ""
+    home: str = ""
+    shell: str = ""
+    mail: str = ""
+    expires: datetime.date | None = None  #: the last valid day
+    may_change_password: bool = True
+    privilege: int = 0
+    hash: str = ""                  #: of the password, as the shadow file has it
+    domain: bool = False
+
+    @property
+    def expired(self) -> bool:
+        return bool(lib.TAVOUserIsExpired(_days(self.expires)))
+
+
+def _days(day: datetime.date | None) -> int:
+    return -1 if day is None else (day - _EPOCH).days
+
+
+def _from_c(record: ffi.CData) -> User:
+    return User(text(record.szName), record.nUid, record.nGid, text(record.szDesc), text(record.szHome),
+                text(record.szShell), text(record.szMail),
+                None if record.nExpired < 0 else _EPOCH + datetime.timedelta(record.nExpired),
+                not record.fCannotChgPasswd, record.nPrivilege, text(record.szPasswd),
+                record.nKind == lib.TAVO_USER_KIND_DOMAIN)
+
+
+class _Record:
+    """A record of the library, freed at the end of its block."""
+
+    def __enter__(self) -> ffi.CData:
+        self._cell = ffi.new("TAVOUSER **")
+        return self._cell
+
+    def __exit__(self, *_: object) -> None:
+        lib.TAVOUserFree(self._cell[0])
+
+
+@wraps("TAVOUserGet")
+def get(name: str) -> User:
+    """The account of this name, in any case of letters; NotFoundError when there is none."""
+    with _Record() as cell:
+        call("TAVOUserGet", name, cell)
+        return _from_c(cell[0])
+
+
+@wraps("TAVOUserGetByUID")
+def get_by_uid(uid: int) -> User:
+    with _Record() as cell:
+        call("TAVOUserGetByUID", uid, cell)
+        return _from_c(cell[0])
+
+
+@wraps("TAVOUserEnum", "TAVOUserEnumByPrefix", "TAVOUserEnumBySubstr")
+def names(prefix: str = "", containing: str = "") -> list[str]:
+    """The names of the local accounts, those of the system left out."""
+    if prefix and containing:
+        return [name for name in names(prefix) if name in set(names(containing=containing))]
+    if containing:
+        return taken("TAVOUserEnumBySubstr", lib.TAVO_USER_LOCAL, containing, place=0)
+    return taken("TAVOUserEnumByPrefix", lib.TAVO_USER_LOCAL, prefix, place=0)
+
+
+def all() -> list[User]:
+    """The accounts of `names`."""
+    return [get(name) for name in names()]
+
+
+def _set(old: str | None, user: User, password: str) -> None:
+    with _Record() as cell:
+        call("TAVOUserAlloc", cell, user.name, password, user.uid, user.gid, user.description, user.home, user.shell,
+             _days(user.expires), not user.may_change_password, user.mail, user.privilege)
+        # The library skips an entry that it refuses, returns 0, and leaves the code.
+        result, error = quietly("TAVOUserSetOne", old, cell[0])
+        if error is not None and (result < 0 or error.name in _REFUSED):
+            raise error
+
+
+_REFUSED = {"ERR_INVALID_USERNAME", "ERR_USER_EXISTS", "ERR_NO_SUCH_USER", "ERR_TOO_MANY_USERS", "ERR_FORMAT_ERROR",
+            "ERR_BAD_PARAMETERS"}
+
+
+@wraps("TAVOUserSetOne", "TAVOUserSet")
+def add(user: User, password: str) -> User:
+    """Adds the account and returns it as it is stored."""
+    _set(None, user, password)
+    return get(user.name)
+
+
+@wraps("TAVOUserSetOne")
+def change(name: str, user: User, password: str | None = None) -> User:
+    """Makes the account what `user` says, also under a new name. Without a password it keeps its own."""
+    _set(name, user, get(name).hash if password is None else password)
+    return get(user.name)
+
+
+@wraps("TAVOUserDelete")
+def delete(*names: str) -> None:
+    """Deletes accounts with all that belongs to them. Names that do not exist are skipped."""
+    given = Texts(names)
+    result, error = quietly("TAVOUserDelete", given.array, len(given))
+    if error is not None and (result < 0 or error.name == "ERR_USER_DB_DELETE"):
+        raise error
+
+
+@wraps("BlTLIBIsUserName")
+def is_name(name: str) -> bool:
+    return bool(lib.BlTLIBIsUserName(to_c(name)))
+
+
+def exists(name: str) -> bool:
+    try:
+        get(name)
+    except Error as error:
+        if error.name in ("ERR_NO_SUCH_USER", "ERR_INVALID_USERNAME"):
+            return False
+        raise
+    return True

@@ -1,0 +1,143 @@
+"""HTML pages: one for each family, a first page with all names, and the indexes."""
+import collections
+import html
+import re
+
+import headers
+import page as pages
+
+_STYLE = """
+:root { color-scheme: light dark; --line: #8884; --soft: #8881; --link: #0b63b0; }
+@media (prefers-color-scheme: dark) { :root { --link: #7ab8f5; } }
+body { font: 16px/1.5 system-ui, sans-serif; margin: 0; display: grid; grid-template-columns: 15rem minmax(0, 52rem); }
+nav { border-right: 1px solid var(--line); padding: 1.5rem 1rem; position: sticky; top: 0; height: 100vh;
+      overflow: auto; box-sizing: border-box; }
+nav a { display: block; padding: .1rem 0; }
+main { padding: 1.5rem 2rem 6rem; }
+a { color: var(--link); text-decoration: none; } a:hover { text-decoration: underline; }
+h2 { margin-top: 2.5rem; padding-top: 1rem; border-top: 1px solid var(--line); font-size: 1.2rem; }
+h3 { margin: 1rem 0 .2rem; font-size: .8rem; text-transform: uppercase; letter-spacing: .06em; opacity: .7; }
+pre, code { font: 14px/1.45 ui-monospace, monospace; } pre { margin: .5rem 0; overflow-x: auto; }
+pre.synopsis { background: var(--soft); padding: .7rem 1rem; border-radius: 6px; }
+p { margin: .5rem 0; } table { border-collapse: collapse; } td, th { padding: .2rem .8rem .2rem 0; text-align: left;
+      vertical-align: top; }
+.section { margin-top: 3rem; padding: .4rem 1rem; background: var(--soft); border-left: 3px solid var(--link); }
+@media (max-width: 50rem) { body { display: block; } nav { position: static; height: auto; border: 0; } }
+"""
+
+_INDEXES = (("errors", "Codes", "by code"), ("files", "Files", "by file"), ("runs", "Programs", "by program"),
+            ("locks", "Locks", "by lock"))
+
+
+def _frame(title, body, families):
+    links = "".join(f'<a href="{family.name}.html">{family.name}</a>' for family in families)
+    indexes = "".join(f'<a href="index-{name}.html">{label}</a>' for name, label, _ in _INDEXES)
+    return (f'<!DOCTYPE html>\n<html lang="en"><head><meta charset="utf-8">'
+            f'<meta name="viewport" content="width=device-width"><title>{html.escape(title)}</title>'
+            f'<link rel="stylesheet" href="style.css"></head><body><nav><a href="index.html"><b>tavosdk</b></a>'
+            f'<h3>Families</h3>{links}<h3>Indexes</h3>{indexes}</nav><main>{body}</main></body></html>\n')
+
+
+class _Linker:
+    def __init__(self, names):
+        self.names = names
+
+    def __call__(self, text, here=None):
+        def link(found):
+            name = found.group()
+            if name not in self.names or name == here:
+                return name
+            return f'<a href="{self.names[name].family.name}.html#{name}">{name}</a>'
+        return re.sub(r"\b[A-Za-z]\w{4,}\b", link, html.escape(text, quote=False))
+
+
+def _prose(text, link, here=None):
+    """Paragraphs filled, indented lines as they are written."""
+    out = []
+    for block in re.split(r"\n\s*\n", text):
+        for indented, lines in _runs_of(block.split("\n")):
+            joined = "\n".join(lines)
+            out.append(f"<pre>{link(joined, here)}</pre>" if indented else f"<p>{link(joined, here)}</p>")
+    return "".join(out)
+
+
+def _runs_of(lines):
+    run, kind = [], None
+    for line in lines:
+        indented = line.startswith("  ")
+        if run and indented != kind:
+            yield kind, run
+            run = []
+        kind = indented
+        run.append(line)
+    if run:
+        yield kind, run
+
+
+def _entry(group, page, link):
+    first = group[0]
+    heading = ", ".join(f'<span id="{entry.name}">{entry.name}</span>' for entry in group)
+    synopsis = "\n".join(html.escape(entry.prototype, quote=False) + ";" for entry in group)
+    out = [f"<h2>{heading}</h2><pre class=synopsis>{synopsis}</pre>", _prose(first.comment.text, link, first.name)]
+    for label, items in (("Files", page.files if first.comment.fixed.get("Files") else []),
+                         ("Programs", page.runs), ("Locks", page.locks)):
+        if items:
+            out.append(f"<h3>{label}</h3><p>{', '.join(link(item) for item in items)}</p>")
+    return "".join(out)
+
+
+def _constants(family):
+    if not family.constants:
+        return ""
+    rows = "".join(f"<tr><td><code>{name}</code><td><code>{html.escape(value or '')}</code>"
+                   f"<td>{html.escape(remark)}" for name, value, remark in family.constants)
+    return f"<h2>Constants</h2><table>{rows}</table>"
+
+
+def _index(kind, everything):
+    index = collections.defaultdict(list)
+    for entry, page in everything:
+        for item in getattr(page, kind):
+            key = item[0] if isinstance(item, tuple) else item.split(" ")[0]
+            index[key].append(entry)
+    return index
+
+
+def write(folder, version):
+    folder.mkdir(parents=True, exist_ok=True)
+    families, names = headers.families(), headers.names()
+    everything = pages.pages()
+    page_of = {entry.name: page for entry, page in everything}
+    link = _Linker(names)
+    (folder / "style.css").write_text(_STYLE)
+
+    rows = "".join(f'<tr><td><a href="{family.name}.html">{family.name}</a><td>{link(family.title)}'
+                   f"<td>{len(family.names)}" for family in families)
+    listed = " ".join(f'<a href="{names[name].family.name}.html#{name}">{name}</a><br>' for name in sorted(names))
+    (folder / "index.html").write_text(_frame("tavosdk", (
+        f"<h1>tavosdk {version}</h1><p>The system programming interface of a network-attached-storage appliance: "
+        f"{len(names)} names in {len(families)} families.</p><table><tr><th>Family<th><th>Names</tr>{rows}</table>"
+        f"<h2>All names</h2><p>{listed}</p>"), families))
+
+    for family in families:
+        body = [f"<h1>{link(family.title)}</h1><pre class=synopsis>#include &lt;{family.header}&gt;</pre>",
+                _prose(family.intro.text, link)]
+        done, section = set(), None
+        for entry in family.names:
+            if entry.section.text != section:
+                section = entry.section.text
+                body.append(f'<div class="section">{_prose(section, link)}</div>' if section else "")
+            if entry.name not in done:
+                group = [other for other in family.names if other.name in entry.group] or [entry]
+                done |= {other.name for other in group}
+                body.append(_entry(group, page_of[entry.name], link))
+        body.append(_constants(family))
+        (folder / f"{family.name}.html").write_text(_frame(f"tavosdk: {family.name}", "".join(body), families))
+
+    for kind, label, how in _INDEXES:
+        index = _index(kind, everything)
+        rows = "".join(f"<tr><td><code>{html.escape(key)}</code><td>" + ", ".join(
+            f'<a href="{entry.family.name}.html#{entry.name}">{entry.name}</a>' for entry in index[key])
+            for key in sorted(index))
+        body = f"<h1>{label}</h1><p>Functions {how}.</p><table>{rows}</table>"
+        (folder / f"index-{kind}.html").write_text(_frame(f"tavosdk: {label}", body, families))
