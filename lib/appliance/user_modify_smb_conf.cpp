@@ -1,11 +1,11 @@
 // Renames and removes users and groups in Samba's settings file.
 #include "tavo_appliance.h"
 
-#include "appliance/detail/smb_user_lists.h"
 #include "core/detail/extras.h"
 #include "core/detail/file_rewrite.h"
 #include "core/detail/guard.h"
 #include "core/detail/keep_fault.h"
+#include "core/detail/smb_user_lists.h"
 #include "tavo_str.h"
 
 namespace {

@@ -3,6 +3,7 @@
 
 #include "tavo_lock.h"
 
+#include "account/detail/family_dump.h"
 #include "account/detail/store_seal.h"
 #include "core/detail/extras.h"
 #include "core/detail/keep_fault.h"
@@ -51,12 +52,23 @@ int AccountSession::OpenToRead(std::span<const size_t> stores)
 
 int AccountSession::OpenToChange(unsigned locks)
 {
+    const int code = LockToChange(locks);
+    return code != 0 ? code : OpenAll();
+}
+
+int AccountSession::LockToChange(unsigned locks)
+{
     if (!is_root_)
         return ERR_ACCESS_DENIED;
     if (!LoadExtras())
         return ERR_OPEN_FAILED;
     if (const int code = Lock(locks, TAVO_LOCK_EXCLUSIVE))
         return code;
+    return system_.Take(kLockSeconds) ? 0 : int{ERR_LOCK_FAILED};
+}
+
+int AccountSession::OpenAll()
+{
     std::vector<size_t> all(kind_.family.stores.size());
     std::iota(all.begin(), all.end(), size_t{0});
     return OpenSettled(all);
@@ -92,6 +104,15 @@ int AccountSession::Seal(Texts texts)
     if (code == 0)
         WriteSeal(kind_.family, texts == Texts::kWritten ? StampTexts(kind_.family) : texts_);
     return code;
+}
+
+int AccountSession::SealWritten()
+{
+    std::vector<TAVOBDB *> stores;
+    for (const std::unique_ptr<Btree> &store : stores_)
+        stores.push_back(store.get());
+    RecordSyncTimes(kind_.family, stores);
+    return Seal(Texts::kWritten);
 }
 
 bool AccountSession::Unlock()

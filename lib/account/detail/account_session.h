@@ -31,6 +31,8 @@ class AccountSession {
 
     // Takes `locks` and the system's lock exclusively and opens all stores. ERR_ACCESS_DENIED to all but root.
     int OpenToChange(unsigned locks);
+    int LockToChange(unsigned locks);  // the two halves of it
+    int OpenAll();
 
     // To look things up in a store, and to change it.
     StoreView *View(size_t index) const { return is_root_ ? Store(index) : text_stores_.View(index); }
@@ -45,6 +47,9 @@ class AccountSession {
     // Closes the stores and seals them: they and the text files agree. ERR_DB_CLOSE when a store could not be written;
     // then it stays unsealed.
     int Seal(Texts texts);
+
+    // The same with the times of the files that were written from the stores.
+    int SealWritten();
 
     // Gives the locks back; false when that failed. The destructor does the same.
     bool Unlock();

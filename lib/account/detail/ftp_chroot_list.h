@@ -11,7 +11,7 @@ class FtpChrootList {
     // A name that stands there goes, and the new one comes at the end. False when the list cannot be read.
     bool Rename(const std::string &old_name, const std::string &new_name);
 
-    bool Store() { return names_.Store(0644); }
+    int Compose(unsigned target, AccountCommit &commit) { return names_.Compose(target, 0644, commit); }
 
   private:
     NameLines names_{"/etc/ftpchroot"};

@@ -2,10 +2,13 @@
 #include "account/detail/group_dump.h"
 
 #include "account/detail/account_name.h"
+#include "account/detail/account_transaction.h"
 #include "account/detail/family_dump.h"
+#include "account/detail/group_accounts.h"
 #include "account/detail/group_line.h"
 #include "account/detail/indexed_accounts.h"
 #include "account/detail/misc_line.h"
+#include "core/detail/log.h"
 
 namespace tavo {
 namespace {
@@ -52,13 +55,32 @@ int ComposeFiles(const TAVOGROUPDB &db, GroupDumpReport &report, std::string (&t
 
 }  // namespace
 
-int DumpGroups(const TAVOGROUPDB &db, GroupDumpReport &report)
+int ComposeGroups(const TAVOGROUPDB &db, AccountCommit &commit, unsigned target, GroupDumpReport &report)
 {
     std::string texts[kGroupTexts];
     if (const int code = ComposeFiles(db, report, texts))
         return code;
     TAVOBDB *const stores[] = {db.pName, db.pGid, db.pDesc};
-    return DumpFamily(kGroupFamily, stores, texts, report.not_opened);
+    return WriteFamily(kGroupFamily, stores, texts, commit, target, report.not_opened);
+}
+
+int CommitGroups(AccountTransaction &change, Where where)
+{
+    GroupDumpReport report;
+    int code = ComposeGroups(GroupDb(change.Session()), change.Files(), kAccountFile, report);
+    if (code == 0) {
+        change.Compose();
+        code = change.Commit();
+    }
+    if (code == 0)
+        return 0;
+    if (report.not_opened)
+        LogErrorAt(where, "%s:%d fail to open file[%s]", report.not_opened);
+    else if (!report.lost.empty())
+        LogErrorAt(where, "%s:%d Group [%s] would be lost, the files are left alone", report.lost);
+    else
+        LogErrorAt(where, "%s:%d Failed to write the group files, tavoerr=0x%04X, errno=%d", code, errno);
+    return code;
 }
 
 }  // namespace tavo

@@ -2,11 +2,15 @@
 #ifndef TAVO_ACCOUNT_DETAIL_GROUP_DUMP_H
 #define TAVO_ACCOUNT_DETAIL_GROUP_DUMP_H
 
+#include "account/detail/account_commit.h"
+#include "core/detail/where.h"
 #include "tavo_group.h"
 
 #include <string>
 
 namespace tavo {
+
+class AccountTransaction;
 
 // What a rewrite that failed has to tell: the caller logs it.
 struct GroupDumpReport {
@@ -14,9 +18,12 @@ struct GroupDumpReport {
     std::string lost;                  // the group that would have been lost
 };
 
-// 0, ERR_OPEN_FAILED, ERR_WRITE_FAILED, ERR_NOT_ENOUGH_SPACE, ERR_RENAME_FAILED, ERR_FORMAT_ERROR (a store holds a line
-// that is no group), or a code of the stores.
-int DumpGroups(const TAVOGROUPDB &db, GroupDumpReport &report);
+// Adds the files to a commit. 0, ERR_OPEN_FAILED, ERR_WRITE_FAILED, ERR_NOT_ENOUGH_SPACE, ERR_FORMAT_ERROR (a store holds a
+// line that is no group), or a code of the stores.
+int ComposeGroups(const TAVOGROUPDB &db, AccountCommit &commit, unsigned target, GroupDumpReport &report);
+
+// Composes the files and commits everything: the end of every change of groups. What goes wrong is logged at `where`.
+int CommitGroups(AccountTransaction &change, Where where = Where());
 
 }  // namespace tavo
 

@@ -45,15 +45,15 @@ void NameLines::Append(const std::string &line)
     changed_ = true;
 }
 
-bool NameLines::Store(mode_t mode_of_new)
+int NameLines::Compose(unsigned target, mode_t mode_of_new, AccountCommit &commit)
 {
     if (!changed_)
-        return true;
+        return 0;
     std::string text;
     for (const std::string &line : lines_)
         text += line;
     changed_ = false;
-    return file_.Replace(text, mode_of_new) == 0;
+    return commit.WriteNeighbour(target, file_, text, mode_of_new);
 }
 
 }  // namespace tavo

@@ -3,7 +3,7 @@
 #ifndef TAVO_ACCOUNT_DETAIL_NAME_LINES_H
 #define TAVO_ACCOUNT_DETAIL_NAME_LINES_H
 
-#include "core/detail/file_rewrite.h"
+#include "account/detail/account_commit.h"
 
 #include <functional>
 #include <string>
@@ -24,8 +24,11 @@ class NameLines {
 
     void Append(const std::string &line);
 
-    // False when what changed could not be written.
-    bool Store(mode_t mode_of_new);
+    bool IsUnreadable() const { return state_ == kUnreadable; }
+    bool IsChanged() const { return changed_; }
+
+    // Adds the new file to a commit, when it has changed. 0 or a code of AccountCommit::WriteNeighbour.
+    int Compose(unsigned target, mode_t mode_of_new, AccountCommit &commit);
 
   private:
     const char *path_;

@@ -55,10 +55,10 @@ bool NetBackupUsers::Remove(const std::string &name)
 }
 
 // The secrets of somebody who is authorised no more go first.
-bool NetBackupUsers::Store()
+int NetBackupUsers::Compose(unsigned target, AccountCommit &commit)
 {
-    const bool stored = secrets_.Store(0600);
-    return authorised_.Store(0600) && stored;
+    const int code = secrets_.Compose(target, 0600, commit);
+    return code != 0 ? code : authorised_.Compose(target, 0600, commit);
 }
 
 }  // namespace tavo

@@ -16,8 +16,11 @@ class NetBackupUsers {
 
     bool Remove(const std::string &name);
 
-    // Writes what has changed. False when that fails.
-    bool Store();
+    bool IsUnreadable() const { return authorised_.IsUnreadable() || secrets_.IsUnreadable(); }
+    bool IsChanged() const { return authorised_.IsChanged() || secrets_.IsChanged(); }
+
+    // Adds what has changed to a commit. 0 or a code of AccountCommit::WriteNeighbour.
+    int Compose(unsigned target, AccountCommit &commit);
 
   private:
     NameLines authorised_{"/usr/tavo/etc/netbkp.users"};

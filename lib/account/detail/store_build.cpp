@@ -1,10 +1,10 @@
 // Builds the stores of a family anew from its text files.
 #include "account/detail/store_build.h"
 
+#include "account/detail/account_commit.h"
 #include "account/detail/btree.h"
 #include "account/detail/free_name.h"
 #include "account/detail/store_seal.h"
-#include "account/detail/text_commit.h"
 #include "core/detail/owner.h"
 #include "tavo_error.h"
 
@@ -141,7 +141,7 @@ int BuildStores(const AccountKind &kind, std::string &texts)
 {
     const StoreFamily &family = kind.family;
     BreakSeal(family);
-    if (const int code = FinishCommit(family))
+    if (const int code = FinishAccountFiles())
         return code;
     texts = StampTexts(family);
     StoreContent content;

@@ -29,7 +29,6 @@ struct TextRow {
 struct StoreFamily {
     const char *prefix;  // what the names of all store files of the family begin with
     const char *seal;    // the record that the stores match the text files
-    const char *marker;  // stands while text files are being moved into place: not under /tmp, it must outlive a reboot
     std::span<const StoreRow> stores;
     std::span<const TextRow> texts;  // in the order in which they are moved into place
 };
@@ -52,7 +51,10 @@ inline constexpr std::array<StoreRow, kUserStores> kUserStoreRows{{
     {TAVO_USER_DB_UID, kUserTextRows[kPasswdText].path, kPublicStore},
 }};
 inline constexpr StoreFamily kUserFamily{
-    "/tmp/.db.user.", "/tmp/.db.user.seal", "/etc/.tavouser.commit", kUserStoreRows, kUserTextRows,
+    "/tmp/.db.user.",
+    "/tmp/.db.user.seal",
+    kUserStoreRows,
+    kUserTextRows,
 };
 
 // The same of the group family.
@@ -69,7 +71,10 @@ inline constexpr std::array<StoreRow, kGroupStores> kGroupStoreRows{{
     {TAVO_GROUP_DB_DESC, kGroupTextRows[kDescText].path, kPublicStore},
 }};
 inline constexpr StoreFamily kGroupFamily{
-    "/tmp/.db.group.", "/tmp/.db.group.seal", "/etc/.tavogroup.commit", kGroupStoreRows, kGroupTextRows,
+    "/tmp/.db.group.",
+    "/tmp/.db.group.seal",
+    kGroupStoreRows,
+    kGroupTextRows,
 };
 
 }  // namespace tavo

@@ -42,6 +42,8 @@ UserBatch::Outcome UserBatch::Store(const char *old_name, const TAVOUSER &user, 
     const Hashing hashing{::time(nullptr), method_};
     if (const int code = PrepareUser(db_, old_name, user, hashing, change))
         return {.code = code, .absent = old_name && code == ERR_NO_SUCH_USER};
+    if (change.key != change.old_key && is_pending_(change.key))
+        return {.code = ERR_REMOVE_FAILED};
     if (uid_code != 0)
         return {.code = uid_code};
     if (const int code = StoreUser(db_, change))

@@ -3,13 +3,20 @@
 #define TAVO_ACCOUNT_DETAIL_USER_BATCH_H
 
 #include "account/detail/user_accounts.h"
+#include "tavo_lock.h"
 
+#include <functional>
 #include <set>
 #include <string>
 #include <utility>
 #include <vector>
 
 namespace tavo {
+
+// What adding, changing and deleting users takes, and tells.
+inline constexpr unsigned kUserChangeLocks = TAVO_LOCK_USER | TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
+inline constexpr int kReadAccountsAgain = 10;  // for the download scheduler
+inline constexpr int kAccountsChanged = 47;    // for the event daemon
 
 // What the rest of the system has to follow up for an entry that was applied.
 struct DoneUser {
@@ -26,7 +33,12 @@ struct DoneUser {
 
 class UserBatch {
   public:
-    explicit UserBatch(const TAVOUSERDB &db) : db_(db) {}
+    // `is_pending`: whether rights of a deleted or renamed account of that key are still to be taken away. Nobody gets its
+    // name until they are.
+    UserBatch(const TAVOUSERDB &db, std::function<bool(const std::string &key)> is_pending)
+        : db_(db), is_pending_(std::move(is_pending))
+    {
+    }
 
     // How an entry came out. A damaged store ends the batch: nothing of it may be kept.
     struct Outcome {
@@ -44,6 +56,7 @@ class UserBatch {
     Outcome Store(const char *old_name, const TAVOUSER &user, int uid_code, bool uid_is_chosen);
 
     const TAVOUSERDB &db_;
+    const std::function<bool(const std::string &key)> is_pending_;
     const HashMethod method_ = ConfiguredHashMethod();
     std::set<std::string> old_keys_;
     std::vector<DoneUser> done_;

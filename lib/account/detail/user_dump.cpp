@@ -73,13 +73,13 @@ int ComposeFiles(const TAVOUSERDB &db, DumpReport &report, std::string (&texts)[
 
 }  // namespace
 
-int DumpUsers(const TAVOUSERDB &db, DumpReport &report)
+int ComposeUsers(const TAVOUSERDB &db, AccountCommit &commit, DumpReport &report)
 {
     std::string texts[kUserTexts];
     if (const int code = ComposeFiles(db, report, texts))
         return code;
     TAVOBDB *const stores[] = {db.pName, db.pMisc, db.pShadow, db.pSmb, db.pUid};
-    return DumpFamily(kUserFamily, stores, texts, report.not_opened);
+    return WriteFamily(kUserFamily, stores, texts, commit, kAccountFile, report.not_opened);
 }
 
 }  // namespace tavo

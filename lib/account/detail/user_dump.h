@@ -2,12 +2,15 @@
 #ifndef TAVO_ACCOUNT_DETAIL_USER_DUMP_H
 #define TAVO_ACCOUNT_DETAIL_USER_DUMP_H
 
+#include "account/detail/account_commit.h"
 #include "tavo_user.h"
 
 #include <string>
 #include <vector>
 
 namespace tavo {
+
+class AccountTransaction;
 
 // What a rewrite of the files has to tell: the caller logs it.
 struct DumpReport {
@@ -20,9 +23,13 @@ struct DumpReport {
     std::string lost;                  // the account that would have been lost
 };
 
-// 0, ERR_OPEN_FAILED, ERR_WRITE_FAILED, ERR_NOT_ENOUGH_SPACE, ERR_RENAME_FAILED, ERR_FORMAT_ERROR (a store holds a line
-// that is no account), or a code of the stores.
-int DumpUsers(const TAVOUSERDB &db, DumpReport &report);
+// Adds the files to a commit. 0, ERR_OPEN_FAILED, ERR_WRITE_FAILED, ERR_NOT_ENOUGH_SPACE, ERR_FORMAT_ERROR (a store holds a
+// line that is no account), or a code of the stores.
+int ComposeUsers(const TAVOUSERDB &db, AccountCommit &commit, DumpReport &report);
+
+// Composes the files and commits everything: the end of every change of users. A failure is logged and reported under the
+// name of TAVOUserDBDump, which log watchers know: -1.
+int CommitUsers(AccountTransaction &change);
 
 }  // namespace tavo
 

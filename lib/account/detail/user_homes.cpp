@@ -1,6 +1,8 @@
 // The home folders of users that are added, renamed and deleted.
+#include "account/detail/user_homes.h"
+
 #include "account/detail/account_name.h"
-#include "account/detail/user_follow_up.h"
+#include "account/detail/setting_switch.h"
 #include "core/detail/keep_fault.h"
 #include "core/detail/list_owner.h"
 #include "core/detail/open_file.h"
@@ -11,10 +13,12 @@
 #include <charconv>
 #include <filesystem>
 
+#include <sys/file.h>
+
 namespace tavo {
 namespace {
 
-constexpr char kShares[] = "/usr/tavo/etc/share.conf";
+constexpr char kShareSettings[] = "/usr/tavo/etc/share.conf";
 constexpr mode_t kHomeMode = 0755;
 
 // A folder's name, never a path: accounts of other systems may be called anything.
@@ -28,18 +32,27 @@ Fd OpenDirectory(const char *path)
     return OpenFd(path, O_RDONLY | O_DIRECTORY);
 }
 
-// Where the share "homes" lies; empty when there is none.
+// 0 when there is no such folder.
+uint64_t InodeOf(const Fd &folder, const std::string &name)
+{
+    struct stat st;
+    return folder && IsFolderName(name) && ::fstatat(folder.Get(), name.c_str(), &st, AT_SYMLINK_NOFOLLOW) == 0
+               ? uint64_t{st.st_ino}
+               : 0;
+}
+
+// Where the share "homes" is; empty when there is none.
 std::string PathOfHomes()
 {
     const KeepFault keep;
     HashOwner pairs(PshTLIBSzHashAlloc(1024));
-    if (!pairs || TLIBFileGetSection(kShares, "homes", pairs.Addr()) < 0)
+    if (!pairs || TLIBFileGetSection(kShareSettings, "homes", pairs.Addr()) < 0)
         return {};
     const char *path = SzTLIBSzHashGetValue(pairs.Get(), "path");
     return path ? path : "";
 }
 
-// "/volume3/homes" lies on "/volume3"; empty for a path of another form.
+// "/volume3/homes" is on "/volume3"; empty for a path of another form.
 std::string VolumeOf(std::string_view path)
 {
     constexpr std::string_view begin = "/volume";
@@ -53,6 +66,68 @@ std::string VolumeOf(std::string_view path)
     return std::string(begin) + std::to_string(number);
 }
 
+HomeResult MakeHome(const HomeStep &step)
+{
+    const Fd homes = OpenDirectory(kHomes);
+    if (!homes || !IsFolderName(step.name))
+        return HomeResult::kFailed;
+    const bool made = ::mkdirat(homes.Get(), step.name.c_str(), kHomeMode) == 0;
+    if (!made && errno != EEXIST)
+        return HomeResult::kFailed;
+    const Fd home(::openat(homes.Get(), step.name.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
+    return home && (!made || ::fchmod(home.Get(), kHomeMode) == 0) &&
+                   ::fchown(home.Get(), static_cast<uid_t>(step.uid), static_cast<gid_t>(step.gid)) == 0
+               ? HomeResult::kDone
+               : HomeResult::kFailed;
+}
+
+HomeResult MoveHome(const HomeStep &step)
+{
+    const Fd homes = OpenDirectory(kHomes);
+    if (InodeOf(homes, step.name) != step.inode)
+        return HomeResult::kDone;
+    // Never into or over a folder that is there already.
+    if (IsFolderName(step.new_name) &&
+        ::renameat2(homes.Get(), step.name.c_str(), homes.Get(), step.new_name.c_str(), RENAME_NOREPLACE) == 0)
+        return HomeResult::kDone;
+    return errno == EXDEV ? HomeResult::kElsewhere : HomeResult::kFailed;
+}
+
+// The staging folder, made when it is not there. Ours, not a link that leads elsewhere.
+Fd OpenStage(const std::string &path)
+{
+    const std::string scratch = std::filesystem::path(path).parent_path();
+    if ((::mkdir(scratch.c_str(), 0777) != 0 && errno != EEXIST) ||
+        (::mkdir(path.c_str(), 0777) != 0 && errno != EEXIST))
+        return Fd();
+    Fd stage(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
+    struct stat st;
+    return stage && ::fstat(stage.Get(), &st) == 0 && st.st_uid == ::geteuid() ? std::move(stage) : Fd();
+}
+
+const std::string *StageOn(const std::string &volume, const std::vector<std::string> &stages)
+{
+    for (auto stage = stages.rbegin(); stage != stages.rend(); ++stage)
+        if (stage->starts_with(volume + '/'))
+            return &*stage;
+    return nullptr;
+}
+
+HomeResult StageHome(const HomeStep &step, const std::vector<std::string> &stages)
+{
+    const std::string path = PathOfHomes();
+    const Fd homes = path.empty() ? Fd() : OpenDirectory(path.c_str());
+    if (InodeOf(homes, step.name) != step.inode)
+        return HomeResult::kDone;
+    const std::string *stage = StageOn(VolumeOf(path), stages);
+    const Fd aside = stage ? OpenStage(*stage) : Fd();
+    if (!aside)
+        return HomeResult::kFailed;
+    if (::renameat(homes.Get(), step.name.c_str(), aside.Get(), step.name.c_str()) == 0)
+        return HomeResult::kDone;
+    return errno == EXDEV ? HomeResult::kElsewhere : HomeResult::kFailed;
+}
+
 bool MoveByCommand(const std::string &from, const std::string &to)
 {
     const std::optional<std::string> command = ShellCommand("/bin/mv %s %s > /dev/null 2>&1", from, to);
@@ -61,52 +136,67 @@ bool MoveByCommand(const std::string &from, const std::string &to)
 
 }  // namespace
 
-bool CreateHome(const DoneUser &user)
+void PlanHomes(std::span<const DoneUser> done, Marker &marker)
 {
+    if (!SettingIsYes(kSettings, "userHomeEnable"))
+        return;
     const Fd homes = OpenDirectory(kHomes);
-    if (!homes || !IsFolderName(user.name))
-        return false;
-    const bool made = ::mkdirat(homes.Get(), user.name.c_str(), kHomeMode) == 0;
-    if (!made && errno != EEXIST)
-        return false;
-    const Fd home(::openat(homes.Get(), user.name.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
-    return home && (!made || ::fchmod(home.Get(), kHomeMode) == 0) &&
-           ::fchown(home.Get(), static_cast<uid_t>(user.uid), static_cast<gid_t>(user.gid)) == 0;
+    for (const DoneUser &user : done) {
+        if (user.IsAdded())
+            marker.homes.push_back({HomeStep::kMake, user.name, {}, user.uid, user.gid, 0});
+        else if (user.IsRenamed())
+            if (const uint64_t inode = InodeOf(homes, user.old_name))
+                marker.homes.push_back({HomeStep::kMove, user.old_name, user.name, -1, -1, inode});
+    }
 }
 
-bool MoveHome(const std::string &old_name, const std::string &new_name)
+void PlanRemovals(std::span<const std::string> names, Marker &marker)
 {
-    const Fd homes = OpenDirectory(kHomes);
-    if (!homes || !IsFolderName(old_name) || !IsFolderName(new_name))
-        return false;
-    // Never into or over a folder that is there already.
-    if (::renameat2(homes.Get(), old_name.c_str(), homes.Get(), new_name.c_str(), RENAME_NOREPLACE) == 0)
-        return true;
-    return errno == EXDEV && MoveByCommand(kHomes + old_name, kHomes + new_name);
+    const std::string path = PathOfHomes();
+    const std::string volume = VolumeOf(path);
+    const Fd homes = volume.empty() ? Fd() : OpenDirectory(path.c_str());
+    const size_t before = marker.homes.size();
+    for (const std::string &name : names)
+        if (const uint64_t inode = InodeOf(homes, name))
+            marker.homes.push_back({HomeStep::kRemove, name, {}, -1, -1, inode});
+    if (marker.homes.size() > before)
+        marker.stages.push_back(volume + "/@tmp/@del_users_home_" + std::to_string(::getpid()));
 }
 
-bool RemoveHomes(std::span<const std::string> names)
+HomeResult TakeHomeStep(const HomeStep &step, const std::vector<std::string> &stages)
 {
-    const std::string homes_path = PathOfHomes();
-    const std::string volume = VolumeOf(homes_path);
-    const Fd homes = volume.empty() ? Fd() : OpenDirectory(homes_path.c_str());
-    if (!homes)
+    switch (step.kind) {
+    case HomeStep::kMake:
+        return MakeHome(step);
+    case HomeStep::kMove:
+        return MoveHome(step);
+    default:
+        return StageHome(step, stages);
+    }
+}
+
+bool MoveHomeElsewhere(const HomeStep &step, const std::vector<std::string> &stages)
+{
+    if (step.kind == HomeStep::kMove)
+        return MoveByCommand(kHomes + step.name, kHomes + step.new_name);
+    const std::string path = PathOfHomes();
+    const std::string *stage = StageOn(VolumeOf(path), stages);
+    return stage && MoveByCommand(path + '/' + step.name, *stage);
+}
+
+bool RemoveStage(const std::string &path, bool &theirs)
+{
+    const Fd stage(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
+    theirs = false;
+    if (!stage)
+        return errno == ENOENT;
+    if (::flock(stage.Get(), LOCK_EX | LOCK_NB) != 0) {
+        theirs = true;
         return true;
-    const std::string scratch = volume + "/@tmp";
-    const std::string staging = scratch + "/@del_users_home_" + std::to_string(::getpid());
-    if ((::mkdir(scratch.c_str(), 0777) != 0 && errno != EEXIST) || ::mkdir(staging.c_str(), 0777) != 0)
-        return false;
-    const Fd aside(::open(staging.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
-    bool moved = static_cast<bool>(aside);
-    for (const std::string &name : names) {
-        if (!aside || !IsFolderName(name) || ::renameat(homes.Get(), name.c_str(), aside.Get(), name.c_str()) == 0 ||
-            errno == ENOENT)
-            continue;
-        moved = MoveByCommand(homes_path + '/' + name, staging) && moved;
     }
     std::error_code error;
-    std::filesystem::remove_all(staging, error);  // removes links, never what they lead to
-    return moved && !error;
+    std::filesystem::remove_all(path, error);  // removes links, never what they lead to
+    return !error;
 }
 
 }  // namespace tavo

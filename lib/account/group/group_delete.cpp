@@ -2,23 +2,24 @@
 #include "tavo_group.h"
 
 #include "account/detail/account_name.h"
-#include "account/detail/group_commit.h"
+#include "account/detail/account_transaction.h"
+#include "account/detail/group_accounts.h"
+#include "account/detail/group_dump.h"
 #include "account/detail/group_texts.h"
-#include "account/detail/share_groups.h"
 #include "core/detail/guard.h"
-#include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
-#include "tavo_appliance.h"
 #include "tavo_lock.h"
+
+#include <map>
 
 namespace {
 
-constexpr unsigned kLocks = TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
+constexpr unsigned kLocksOfDelete = TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
 
-using Keys = std::set<std::string>;
+using Deleted = std::map<std::string, std::string>;  // key to name
 
 // Deletes one group; what goes wrong is logged and stays in the error state.
-void DeleteOne(const TAVOGROUPDB &db, const char *name, Keys &deleted)
+void DeleteOne(const TAVOGROUPDB &db, const char *name, Deleted &deleted)
 {
     if (name && tavo::IsDomainName(name))
         return;  // lives in its domain
@@ -36,21 +37,7 @@ void DeleteOne(const TAVOGROUPDB &db, const char *name, Keys &deleted)
         Fail(code);
         return LogError("%s:%d TAVOGroupDBDelete %s failed. tavoerr=0x%04X", name, code);
     }
-    deleted.insert(*key);
-}
-
-// The groups are gone whatever comes of this.
-void RemoveFromLists(const Keys &deleted)
-{
-    const tavo::KeepFault keep;
-    tavo::HashOwner names(PshTLIBSzHashAlloc(1024));
-    for (const std::string &key : deleted)
-        if (!names || TLIBSzHashSetValue(names.Addr(), ('@' + key).c_str(), "") < 0)
-            return LogError("%s:%d Failed to note the removal of [%s]", key.c_str());
-    if (const int code = tavo::ChangeGroupsInShares(names.Get()))
-        LogError("%s:%d Delete groups in shares failed. tavoerr=0x%04X", code);
-    if (TAVOUserModifySmbConf(names.Get()) != 0)
-        LogError("%s:%d Delete groups in smb.conf failed.");
+    deleted.emplace(*key, group.name);
 }
 
 }  // namespace
@@ -62,17 +49,18 @@ extern "C" int TAVOGroupDelete(const char *const *rgszName, int nGroup)
     if (!rgszName || nGroup < 0)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        tavo::AccountSession session(tavo::kGroupKind);
-        if (const int code = session.OpenToChange(kLocks))
+        tavo::AccountTransaction change(tavo::kGroupKind);
+        if (const int code = change.Begin(kLocksOfDelete))
             return Fail(code);
-        Keys deleted;
-        session.BeginChange();
+        Deleted deleted;
+        change.Session().BeginChange();
         for (int i = 0; i < nGroup; ++i)
-            DeleteOne(tavo::GroupDb(session), rgszName[i], deleted);
-        if (const int code = tavo::CommitGroups(session))
+            DeleteOne(tavo::GroupDb(change.Session()), rgszName[i], deleted);
+        for (const auto &[key, name] : deleted)
+            change.Files().Steps().names.push_back(
+                {.is_group = true, .targets = tavo::kShareLists | tavo::kSambaLists, .old_name = name, .new_name = {}});
+        if (const int code = tavo::CommitGroups(change))
             return Fail(code);
-        if (!deleted.empty())
-            RemoveFromLists(deleted);
-        return session.Unlock() ? 0 : Fail(ERR_UNLOCK_FAILED);
+        return change.End() ? 0 : Fail(ERR_UNLOCK_FAILED);
     });
 }

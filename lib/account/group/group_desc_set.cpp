@@ -2,7 +2,9 @@
 #include "tavo_group.h"
 
 #include "account/detail/account_name.h"
-#include "account/detail/group_commit.h"
+#include "account/detail/account_transaction.h"
+#include "account/detail/group_accounts.h"
+#include "account/detail/group_dump.h"
 #include "account/detail/group_texts.h"
 #include "core/detail/guard.h"
 #include "tavo_lock.h"
@@ -16,9 +18,10 @@ extern "C" int TAVOGroupDescSet(const char *szName, const char *szDesc)
         const std::optional<std::string> key = tavo::AccountKey(szName, tavo::kGroupKeySize);
         if (!key)
             return Fail(ERR_INVALID_GROUPNAME);
-        tavo::AccountSession session(tavo::kGroupKind);
-        if (const int code = session.OpenToChange(TAVO_LOCK_GROUP))
+        tavo::AccountTransaction change(tavo::kGroupKind);
+        if (const int code = change.Begin(TAVO_LOCK_GROUP))
             return Fail(code);
+        tavo::AccountSession &session = change.Session();
         tavo::GroupLine group;
         if (const int code = tavo::ReadGroupLine(tavo::GroupDb(session), *key, group))
             return Fail(code);
@@ -27,9 +30,9 @@ extern "C" int TAVOGroupDescSet(const char *szName, const char *szDesc)
         int code = *text ? descriptions.Set(*key, tavo::FormatGroupDescLine(group.name, text).append(1, '\0'))
                          : descriptions.Delete(*key);
         if (code == 0 || (code == ERR_KEY_NOT_FOUND && !*text))
-            code = tavo::CommitGroups(session);
+            code = tavo::CommitGroups(change);
         if (code != 0)
             return Fail(code);
-        return session.Unlock() ? 0 : Fail(ERR_UNLOCK_FAILED);
+        return change.End() ? 0 : Fail(ERR_UNLOCK_FAILED);
     });
 }

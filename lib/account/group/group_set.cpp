@@ -2,36 +2,22 @@
 #include "tavo_group.h"
 
 #include "account/detail/account_name.h"
-#include "account/detail/group_commit.h"
+#include "account/detail/account_transaction.h"
+#include "account/detail/group_accounts.h"
+#include "account/detail/group_dump.h"
 #include "account/detail/group_texts.h"
-#include "account/detail/share_groups.h"
 #include "core/detail/guard.h"
-#include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
-#include "tavo_appliance.h"
 #include "tavo_lock.h"
 
 namespace {
 
-constexpr unsigned kLocks = TAVO_LOCK_USER | TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
+constexpr unsigned kLocksOfSet = TAVO_LOCK_USER | TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
 
-// The group is renamed whatever comes of this.
-void RenameEverywhere(const std::string &old_key, const std::string &new_name)
+int Apply(tavo::AccountTransaction &transaction, const char *old_name, const TAVOGROUP &group,
+          tavo::GroupChange &change)
 {
-    const tavo::KeepFault keep;
-    tavo::HashOwner names(PshTLIBSzHashAlloc(1024));
-    const std::string old_entry = "@" + old_key;
-    if (!names || TLIBSzHashSetValue(names.Addr(), old_entry.c_str(), new_name.c_str()) < 0)
-        return LogError("%s:%d Failed to note the rename to [%s]", new_name);
-    if (const int code = tavo::ChangeGroupsInShares(names.Get()))
-        LogError("%s:%d Rename group in shares failed. tavoerr=0x%04X", code);
-    if (TAVOUserModifySmbConf(names.Get()) != 0)
-        LogError("%s:%d Rename group in smb.conf failed.");
-}
-
-int Apply(tavo::AccountSession &session, const char *old_name, const TAVOGROUP &group, tavo::GroupChange &change)
-{
-    const TAVOGROUPDB db = tavo::GroupDb(session);
+    const TAVOGROUPDB db = tavo::GroupDb(transaction.Session());
     const bool choose = !old_name && group.nGid == -1;
     int32_t gid = group.nGid;
     if (choose)
@@ -39,7 +25,9 @@ int Apply(tavo::AccountSession &session, const char *old_name, const TAVOGROUP &
             return code;
     if (const int code = tavo::PrepareGroup(db, old_name, group, gid, change))
         return code;
-    session.BeginChange();
+    if (change.key != change.old_key && transaction.IsPending(true, change.key))
+        return ERR_REMOVE_FAILED;
+    transaction.Session().BeginChange();
     if (const int code = tavo::StoreGroup(db, change))
         return code;
     return choose ? tavo::Btree::Of(db.pGid)->SetNumber(tavo::kCurrentGidKey, gid) : 0;
@@ -56,17 +44,20 @@ extern "C" int TAVOGroupSet(const char *szOldName, const TAVOGROUP *pGroup)
             LogError("%s:%d Cannot set not-local group. group name=[%s]", pGroup->szName);
             return Fail(ERR_INVALID_GROUPNAME);
         }
-        tavo::AccountSession session(tavo::kGroupKind);
-        if (const int code = session.OpenToChange(kLocks))
+        tavo::AccountTransaction transaction(tavo::kGroupKind);
+        if (const int code = transaction.Begin(kLocksOfSet))
             return Fail(code);
         tavo::GroupChange change;
-        int code = Apply(session, szOldName, *pGroup, change);
+        int code = Apply(transaction, szOldName, *pGroup, change);
+        if (code == 0 && !change.old_name.empty() && change.old_name != change.line.name)
+            transaction.Files().Steps().names.push_back({.is_group = true,
+                                                         .targets = tavo::kShareLists | tavo::kSambaLists,
+                                                         .old_name = change.old_name,
+                                                         .new_name = change.line.name});
         if (code == 0)
-            code = tavo::CommitGroups(session);
+            code = tavo::CommitGroups(transaction);
         if (code != 0)
             return Fail(code);
-        if (!change.old_name.empty() && change.old_name != change.line.name)
-            RenameEverywhere(change.old_key, change.line.name);
-        return session.Unlock() ? 0 : Fail(ERR_UNLOCK_FAILED);
+        return transaction.End() ? 0 : Fail(ERR_UNLOCK_FAILED);
     });
 }

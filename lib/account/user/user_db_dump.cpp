@@ -1,9 +1,48 @@
 // Writes the four account files from the open stores.
 #include "tavo_user.h"
 
+#include "account/detail/account_transaction.h"
+#include "account/detail/family_dump.h"
+#include "account/detail/user_accounts.h"
 #include "account/detail/user_dump.h"
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
+
+namespace {
+
+using tavo::DumpReport;
+
+// Accounts of the system have no Samba password and no privileges: nothing that needs looking after.
+void LogMissing(const DumpReport &report)
+{
+    for (const DumpReport::Missing &missing : report.missing)
+        LogDebug("%s:%d No record of [%s] for %s", missing.name, missing.file);
+}
+
+int FailUserDump(int code, const DumpReport &report)
+{
+    if (report.not_opened)
+        LogError("%s:%d fail to open file[%s]", report.not_opened);
+    else if (!report.lost.empty())
+        LogError("%s:%d Account [%s] would be lost, the files are left alone", report.lost);
+    else
+        LogError("%s:%d Failed to write the account files, tavoerr=0x%04X, errno=%d", code, errno);
+    return Fail(code);
+}
+
+}  // namespace
+
+int tavo::CommitUsers(AccountTransaction &change)
+{
+    DumpReport report;
+    int code = ComposeUsers(UserDb(change.Session()), change.Files(), report);
+    LogMissing(report);
+    if (code == 0) {
+        change.Compose();
+        code = change.Commit();
+    }
+    return code == 0 ? 0 : FailUserDump(code, report);
+}
 
 extern "C" int TAVOUserDBDump(TAVOUSERDB *pDb)
 {
@@ -11,18 +50,19 @@ extern "C" int TAVOUserDBDump(TAVOUSERDB *pDb)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         tavo::DumpReport report;
-        const int code = tavo::DumpUsers(*pDb, report);
-        // Accounts of the system have no Samba password and no privileges: nothing that needs looking after.
-        for (const tavo::DumpReport::Missing &missing : report.missing)
-            LogDebug("%s:%d No record of [%s] for %s", missing.name, missing.file);
+        tavo::Marker earlier;
+        if (const int code = tavo::ResumeCommit(earlier))
+            return FailUserDump(code, report);
+        tavo::AccountCommit commit(std::move(earlier));
+        int code = tavo::ComposeUsers(*pDb, commit, report);
+        LogMissing(report);
         if (code == 0)
-            return 0;
-        if (report.not_opened)
-            LogError("%s:%d fail to open file[%s]", report.not_opened);
-        else if (!report.lost.empty())
-            LogError("%s:%d Account [%s] would be lost, the files are left alone", report.lost);
-        else
-            LogError("%s:%d Failed to write the account files, tavoerr=0x%04X, errno=%d", code, errno);
-        return Fail(code);
+            code = commit.Commit();
+        if (code != 0)
+            return FailUserDump(code, report);
+        TAVOBDB *const stores[] = {pDb->pName, pDb->pMisc, pDb->pShadow, pDb->pSmb, pDb->pUid};
+        tavo::RecordSyncTimes(tavo::kUserFamily, stores);
+        commit.Settle();
+        return 0;
     });
 }

@@ -2,26 +2,22 @@
 #include "tavo_user.h"
 
 #include "account/detail/account_name.h"
-#include "account/detail/account_session.h"
-#include "account/detail/net_backup_users.h"
+#include "account/detail/account_transaction.h"
 #include "account/detail/setting_switch.h"
 #include "account/detail/smb_connections.h"
-#include "account/detail/user_follow_up.h"
+#include "account/detail/user_dump.h"
 #include "account/detail/user_texts.h"
 #include "core/detail/guard.h"
 #include "core/detail/keep_fault.h"
+#include "core/detail/list_owner.h"
 #include "core/detail/log.h"
 #include "tavo_appliance.h"
-#include "tavo_group.h"
 #include "tavo_lock.h"
 #include "tavo_quota.h"
 
 #include <set>
 
 namespace {
-
-constexpr unsigned kLocks = TAVO_LOCK_USER | TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
-constexpr int kReadAccountsAgain = 10;  // for the download scheduler
 
 struct Doomed {
     std::string key;
@@ -70,36 +66,31 @@ void ClearQuotas(const std::vector<Doomed> &doomed)
         LogError("%s:%d TAVOQuotaClean error.");
 }
 
-void RemoveFromLists(const std::vector<Doomed> &doomed)
+void TellServices(const std::vector<Doomed> &doomed)
 {
-    const tavo::KeepFault keep;  // the accounts are gone whatever comes of this
-    tavo::HashOwner names;
-    for (const Doomed &user : doomed)
-        if (!tavo::AddNameChange(names, user.name, ""))
-            LogError("%s:%d Failed to note the removal of [%s]", user.name);
-    if (!names)
-        return;
-    if (TAVOUserModifySmbConf(names.Get()) != 0)
-        LogError("%s:%d Delete users in smb.conf failed. tavoerr=0x%04X", tavoerrno);
-    if (TAVOUserModifyGroup(names.Get()) != 0)
-        LogError("%s:%d Delete users in groups failed. tavoerr=0x%04X", tavoerrno);
-    tavo::NetBackupUsers backup;
-    for (const Doomed &user : doomed)
-        if (!backup.Remove(user.name))
-            LogError("%s:%d Failed to remove the network backup credentials of [%s]", user.name);
-    if (!backup.Store())
-        LogError("%s:%d Failed to store the network backup credentials, errno=%d", errno);
+    if (tavo::SettingIsYes(tavo::kFactorySettings, "support_download") &&
+        TAVOSchedulerHup(tavo::kReadAccountsAgain) != 0)
+        LogError("%s:%d Failed to signal scheduled.");
+    if (tavo::SettingIsYes(tavo::kSettings, "runsamba"))
+        for (const Doomed &user : doomed)
+            tavo::EndSmbConnections(user.name);
 }
 
-void RemoveFolders(const std::vector<Doomed> &doomed)
+// What else on the appliance knows these users.
+void PlanRemoval(const std::vector<Doomed> &doomed, tavo::AccountTransaction &change)
 {
+    const tavo::KeepFault keep;
+    tavo::Marker &steps = change.Files().Steps();
     std::vector<std::string> names;
-    for (const Doomed &user : doomed)
+    for (const Doomed &user : doomed) {
         names.push_back(user.name);
-    if (!tavo::RemoveHomes(names)) {
-        Fail(ERR_REMOVE_FAILED);
-        LogError("%s:%d Remove user folders failed");
+        steps.names.push_back({.targets = tavo::kSambaLists | tavo::kMemberLists | tavo::kBackupUsers,
+                               .old_name = user.name,
+                               .new_name = {}});
+        if (!change.Backup().Remove(user.name))
+            LogError("%s:%d Failed to remove the network backup credentials of [%s]", user.name);
     }
+    tavo::PlanRemovals(names, steps);
 }
 
 }  // namespace
@@ -111,35 +102,30 @@ extern "C" int TAVOUserDelete(const char *const *rgszName, int nUser)
     if (!rgszName || nUser < 0)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        tavo::AccountSession session(tavo::kUserKind);
-        if (const int code = session.OpenToChange(kLocks))
+        tavo::AccountTransaction change(tavo::kUserKind);
+        if (const int code = change.Begin(tavo::kUserChangeLocks))
             return Fail(code);
-        TAVOUSERDB db = tavo::UserDb(session);
+        TAVOUSERDB db = tavo::UserDb(change.Session());
         const std::vector<Doomed> doomed = Collect(db, rgszName, nUser);
         ClearQuotas(doomed);
-        session.BeginChange();
+        change.Session().BeginChange();
         for (const Doomed &user : doomed) {
             if (const int code = tavo::RemoveUser(db, user.key, user.uid)) {
                 LogError("%s:%d Failed to delete user [%s], tavoerr=0x%04X", user.name, code);
                 return Fail(code);
             }
         }
-        if (!doomed.empty()) {
-            if (tavo::SettingIsYes(tavo::kFactorySettings, "support_download") &&
-                TAVOSchedulerHup(kReadAccountsAgain) != 0)
-                LogError("%s:%d Failed to signal scheduled.");
-            if (tavo::SettingIsYes(tavo::kSettings, "runsamba"))
-                for (const Doomed &user : doomed)
-                    tavo::EndSmbConnections(user.name);
-            if (TAVOUserDBDump(&db) != 0)
+        if (doomed.empty()) {
+            if (change.Session().Seal(tavo::AccountSession::Texts::kAsBefore) != 0)
+                LogError("%s:%d Failed to close the account stores, errno=%d", errno);
+        } else {
+            TellServices(doomed);
+            PlanRemoval(doomed, change);
+            if (tavo::CommitUsers(change) != 0)
                 return -1;
         }
-        using Texts = tavo::AccountSession::Texts;
-        if (session.Seal(doomed.empty() ? Texts::kAsBefore : Texts::kWritten) != 0)
-            LogError("%s:%d Failed to close the account stores, errno=%d", errno);
-        RemoveFromLists(doomed);
-        if (!doomed.empty())
-            RemoveFolders(doomed);
-        return session.Unlock() ? 0 : Fail(ERR_UNLOCK_FAILED);
+        const bool unlocked = change.End();
+        TLIBScemdNotify(tavo::kAccountsChanged);
+        return unlocked ? 0 : Fail(ERR_UNLOCK_FAILED);
     });
 }

@@ -1,26 +1,19 @@
 // Adds, changes and renames users.
 #include "tavo_user.h"
 
-#include "account/detail/account_session.h"
-#include "account/detail/ftp_chroot_list.h"
-#include "account/detail/net_backup_users.h"
+#include "account/detail/account_transaction.h"
 #include "account/detail/setting_switch.h"
-#include "account/detail/user_follow_up.h"
+#include "account/detail/user_dump.h"
 #include "account/detail/user_texts.h"
 #include "core/detail/guard.h"
 #include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
 #include "tavo_appliance.h"
-#include "tavo_group.h"
 #include "tavo_lock.h"
 
 #include <strings.h>
 
 namespace {
-
-constexpr unsigned kLocks = TAVO_LOCK_USER | TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
-constexpr int kReadAccountsAgain = 10;  // for the download scheduler
-constexpr int kAccountsChanged = 47;    // for the event daemon
 
 // The code of an entry that failed goes to the log and into the error state; the batch goes on.
 void ReportEntry(const tavo::UserBatch::Outcome &outcome, const char *old_name, const TAVOUSER *user)
@@ -34,56 +27,32 @@ void ReportEntry(const tavo::UserBatch::Outcome &outcome, const char *old_name, 
     Fail(outcome.code);
 }
 
-void RenameEverywhere(const std::vector<tavo::DoneUser> &done)
+void SetCredentials(const std::vector<tavo::DoneUser> &done, tavo::NetBackupUsers &backup)
 {
-    const tavo::KeepFault keep;  // the accounts are renamed whatever comes of this
-    tavo::HashOwner names;
+    const tavo::KeepFault keep;
     for (const tavo::DoneUser &user : done)
-        if (user.IsRenamed() && !tavo::AddNameChange(names, user.old_name, user.name))
-            LogError("%s:%d Failed to note the rename of [%s]", user.old_name);
-    if (!names)
-        return;
-    if (TAVOUserModifySmbConf(names.Get()) != 0)
-        LogError("%s:%d Rename users in smb.conf failed. tavoerr=0x%04X", tavoerrno);
-    if (TAVOUserModifyGroup(names.Get()) != 0)
-        LogError("%s:%d Rename users in groups failed. tavoerr=0x%04X", tavoerrno);
-}
-
-void FollowGuest(const tavo::DoneUser &user)
-{
-    if (::strcasecmp(user.name.c_str(), "guest") != 0)
-        return;
-    if (const int code = tavo::SetGuestAfpd(!user.password || !*user.password)) {
-        Fail(code);
-        LogError("%s:%d SDKISetGuestAfpd failed");
-    }
-}
-
-void FollowUp(const std::vector<tavo::DoneUser> &done)
-{
-    const bool homes = tavo::SettingIsYes(tavo::kSettings, "userHomeEnable");
-    const bool has_backup = tavo::SettingIsYes(tavo::kFactorySettings, "netbkp");
-    RenameEverywhere(done);
-    for (const tavo::DoneUser &user : done)
-        FollowGuest(user);
-    tavo::NetBackupUsers backup;
-    for (const tavo::DoneUser &user : done)
-        if (has_backup && !backup.Set(user.old_name, user.name, user.new_password ? user.password : nullptr))
+        if (!backup.Set(user.old_name, user.name, user.new_password ? user.password : nullptr))
             LogError("%s:%d Failed to set the network backup credentials of [%s]", user.name);
-    if (!backup.Store())
-        LogError("%s:%d Failed to store the network backup credentials, errno=%d", errno);
+}
+
+// What else on the appliance knows these users.
+void PlanFollowUp(const std::vector<tavo::DoneUser> &done, tavo::AccountTransaction &change)
+{
+    const bool has_backup = tavo::SettingIsYes(tavo::kFactorySettings, "netbkp");
+    tavo::Marker &steps = change.Files().Steps();
+    const unsigned targets =
+        tavo::kSambaLists | tavo::kMemberLists | tavo::kFtpList | (has_backup ? unsigned{tavo::kBackupUsers} : 0);
     for (const tavo::DoneUser &user : done) {
-        if (homes && user.IsAdded() && !tavo::CreateHome(user))
-            LogError("%s:%d Failed to create the home folder of [%s], errno=%d", user.name, errno);
-        if (homes && user.IsRenamed() && !tavo::MoveHome(user.old_name, user.name))
-            LogError("%s:%d Failed to move the home folder of [%s], errno=%d", user.old_name, errno);
+        if (user.IsRenamed())
+            steps.names.push_back({.targets = targets, .old_name = user.old_name, .new_name = user.name});
+        if (::strcasecmp(user.name.c_str(), "guest") == 0)
+            steps.names.push_back({.targets = tavo::kGuestModule,
+                                   .old_name = user.name,
+                                   .new_name = !user.password || !*user.password ? "yes" : "no"});
     }
-    tavo::FtpChrootList ftp;
-    for (const tavo::DoneUser &user : done)
-        if (user.IsRenamed() && !ftp.Rename(user.old_name, user.name))
-            LogError("%s:%d Failed to rename [%s] in the FTP chroot list", user.old_name);
-    if (!ftp.Store())
-        LogError("%s:%d Failed to store the FTP chroot list, errno=%d", errno);
+    if (has_backup)
+        SetCredentials(done, change.Backup());
+    tavo::PlanHomes(done, steps);
 }
 
 // True when the stores can still be trusted.
@@ -108,24 +77,27 @@ extern "C" int TAVOUserSet(const char *const *rgszOldName, const TAVOUSER *const
     if (!rgszOldName || !rgpUser || nUser < 0)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        tavo::AccountSession session(tavo::kUserKind);
-        if (const int code = session.OpenToChange(kLocks))
+        tavo::AccountTransaction change(tavo::kUserKind);
+        if (const int code = change.Begin(tavo::kUserChangeLocks))
             return Fail(code);
-        TAVOUSERDB db = tavo::UserDb(session);
-        tavo::UserBatch batch(db);
-        session.BeginChange();
+        TAVOUSERDB db = tavo::UserDb(change.Session());
+        tavo::UserBatch batch(db, [&](const std::string &key) { return change.IsPending(false, key); });
+        change.Session().BeginChange();
         if (!ApplyAll(batch, rgszOldName, rgpUser, nUser))
             return -1;
-        if (tavo::SettingIsYes(tavo::kFactorySettings, "support_download") && TAVOSchedulerHup(kReadAccountsAgain) != 0)
+        if (tavo::SettingIsYes(tavo::kFactorySettings, "support_download") &&
+            TAVOSchedulerHup(tavo::kReadAccountsAgain) != 0)
             LogError("%s:%d Failed to signal scheduled.");
-        if (!batch.Done().empty() && TAVOUserDBDump(&db) != 0)
-            return -1;
-        using Texts = tavo::AccountSession::Texts;
-        if (session.Seal(batch.Done().empty() ? Texts::kAsBefore : Texts::kWritten) != 0)
-            LogError("%s:%d Failed to close the account stores, errno=%d", errno);
-        FollowUp(batch.Done());
-        const bool unlocked = session.Unlock();
-        TLIBScemdNotify(kAccountsChanged);
+        if (batch.Done().empty()) {
+            if (change.Session().Seal(tavo::AccountSession::Texts::kAsBefore) != 0)
+                LogError("%s:%d Failed to close the account stores, errno=%d", errno);
+        } else {
+            PlanFollowUp(batch.Done(), change);
+            if (tavo::CommitUsers(change) != 0)
+                return -1;
+        }
+        const bool unlocked = change.End();
+        TLIBScemdNotify(tavo::kAccountsChanged);
         return unlocked ? 0 : Fail(ERR_UNLOCK_FAILED);
     });
 }

@@ -2,11 +2,12 @@
 #include "tavo_user.h"
 
 #include "account/detail/account_name.h"
-#include "account/detail/account_session.h"
+#include "account/detail/account_transaction.h"
 #include "account/detail/colon_fields.h"
 #include "account/detail/shadow_line.h"
 #include "account/detail/smbpasswd_line.h"
 #include "account/detail/user_accounts.h"
+#include "account/detail/user_dump.h"
 #include "account/detail/user_texts.h"
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
@@ -14,8 +15,6 @@
 #include "tavo_lock.h"
 
 namespace {
-
-constexpr int kAccountsChanged = 47;  // for the event daemon
 
 struct NewHashes {
     const char *unix_hash;
@@ -85,12 +84,12 @@ extern "C" int TAVOUserSetPasswd(const TAVOUSER *const *rgpUser, const char *con
     if (nUser == 0)
         return 0;
     return Guard([&] {
-        tavo::AccountSession session(tavo::kUserKind);
-        if (const int code = session.OpenToChange(TAVO_LOCK_USER))
+        tavo::AccountTransaction change(tavo::kUserKind);
+        if (const int code = change.Begin(TAVO_LOCK_USER))
             return Fail(code);
-        TAVOUSERDB db = tavo::UserDb(session);
+        TAVOUSERDB db = tavo::UserDb(change.Session());
         bool changed = false;
-        session.BeginChange();
+        change.Session().BeginChange();
         for (int i = 0; i < nUser; ++i) {
             if (!rgpUser[i] || !rgpUser[i]->szName || !rgszHash[i] || !rgszLmHash[i] || !rgszNtHash[i])
                 continue;
@@ -103,13 +102,12 @@ extern "C" int TAVOUserSetPasswd(const TAVOUSER *const *rgpUser, const char *con
                 return -1;
             changed = changed || outcome.code == 0;
         }
-        if (changed && TAVOUserDBDump(&db) != 0)
+        if (changed && tavo::CommitUsers(change) != 0)
             return -1;
-        using Texts = tavo::AccountSession::Texts;
-        if (session.Seal(changed ? Texts::kWritten : Texts::kAsBefore) != 0)
+        if (!changed && change.Session().Seal(tavo::AccountSession::Texts::kAsBefore) != 0)
             LogError("%s:%d Failed to close the account stores, errno=%d", errno);
-        const bool unlocked = session.Unlock();
-        TLIBScemdNotify(kAccountsChanged);
+        const bool unlocked = change.End();
+        TLIBScemdNotify(tavo::kAccountsChanged);
         return unlocked ? 0 : Fail(ERR_UNLOCK_FAILED);
     });
 }

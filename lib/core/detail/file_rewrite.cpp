@@ -80,9 +80,9 @@ bool FileRewrite::Read(std::string &text)
     }
 }
 
-bool FileRewrite::Complete(TempFile &temp, std::string_view text, mode_t mode_of_new) noexcept
+bool FileRewrite::Complete(Fd &temp, std::string_view text, mode_t mode_of_new) noexcept
 {
-    const int fd = temp.Descriptor();
+    const int fd = temp.Get();
     if (!WriteAll(fd, text))
         return false;
     if (missing_) {
@@ -106,7 +106,7 @@ bool FileRewrite::Complete(TempFile &temp, std::string_view text, mode_t mode_of
 int FileRewrite::ReplaceBy(TempFile &temp, std::string_view text, mode_t mode_of_new)
 {
     const std::string directory = DirectoryOf(target_);
-    if (!Complete(temp, text, mode_of_new))
+    if (!Complete(temp.File(), text, mode_of_new))
         return ERR_WRITE_FAILED;
     if (!temp.RenameTo(target_))
         return ERR_RENAME_FAILED;

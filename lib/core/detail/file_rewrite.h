@@ -30,6 +30,10 @@ class FileRewrite {
     // The same through a temporary file elsewhere; when it lies on another file system, ERR_RENAME_FAILED with EXDEV.
     int ReplaceBy(TempFile &temp, std::string_view text, mode_t mode_of_new = 0666);
 
+    // The first half of that, for callers who move several files together: the text, owner, mode and attributes go into
+    // `temp`, which is synced and closed. False with errno.
+    bool Complete(Fd &temp, std::string_view text, mode_t mode_of_new = 0666) noexcept;
+
     // Whether the last Replace also made its rename durable. It has taken place all the same.
     bool IsDirectorySynced() const noexcept { return directory_synced_; }
 
@@ -37,8 +41,6 @@ class FileRewrite {
     const std::string &Target() const noexcept { return target_; }
 
   private:
-    bool Complete(TempFile &temp, std::string_view text, mode_t mode_of_new) noexcept;
-
     Fd old_;
     struct stat state_ {};
     std::string target_;

@@ -23,6 +23,7 @@ class TempFile {
     void Adopt(Fd fd, std::string path);
 
     int Descriptor() const noexcept { return fd_.Get(); }
+    Fd &File() noexcept { return fd_; }
     const std::string &Path() const noexcept { return path_; }
 
     // Closes; false when the kernel could not take everything.

@@ -1,17 +1,15 @@
-// A program that changes groups dies, while it moves the files into place and at random moments. What the next one
+// A program that changes groups dies at random moments. What the next one
 // finds is the state before or after the change, whole: never one file of each.
 #include "account/group/group_fixture.h"
 #include "support/rounds.h"
 
 #include <gtest/gtest.h>
 
-#include <atomic>
 #include <functional>
 #include <map>
 #include <random>
 #include <sstream>
 
-#include <dlfcn.h>
 #include <signal.h>
 #include <stdio.h>
 #include <sys/mman.h>
@@ -20,57 +18,6 @@
 #include <unistd.h>
 
 namespace {
-
-std::atomic<int> renames_to_live{-1};  // of files below /etc; -1: for ever
-
-}  // namespace
-
-// Takes the place of rename: the process dies before the one that it is not to live to see, or right behind it.
-extern "C" int rename(const char *from, const char *to) noexcept
-{
-    static const auto real = reinterpret_cast<int (*)(const char *, const char *)>(::dlsym(RTLD_NEXT, "rename"));
-    if (std::string_view(to).starts_with("/etc/group") && renames_to_live >= 0 && renames_to_live-- == 0)
-        ::_exit(42);
-    return real(from, to);
-}
-
-namespace {
-
-bool DiesAt(int renames, int (*change)())
-{
-    const pid_t child = ::fork();
-    if (child == 0) {
-        renames_to_live = renames;
-        change();
-        ::_exit(0);
-    }
-    int status = 0;
-    ::waitpid(child, &status, 0);
-    return WIFEXITED(status) && WEXITSTATUS(status) == 42;
-}
-
-TEST(GroupDeath, BetweenTheRenames)
-{
-    const auto change = [] {
-        return test::SetGroup("staff", "crew", 70000, {"alice"});
-    };
-    for (const int renames : {0, 1}) {
-        test::WriteFile("/etc/group", "#$_@GID__INDEX@_$65540$\nroot:x:0:\nstaff:x:65540:bob\n");
-        test::WriteFile("/etc/group_desc", "staff:old hands\n");
-        ASSERT_TRUE(test::GetGroup("staff"));
-        ASSERT_TRUE(DiesAt(renames, change)) << "there are two renames";
-        // The marker had been written, so the change has happened; opening completes it.
-        const test::Group crew = test::GetGroup("crew");
-        ASSERT_TRUE(crew) << renames;
-        EXPECT_EQ(crew->nGid, 70000);
-        EXPECT_FALSE(test::GetGroup("staff"));
-        EXPECT_EQ(test::GroupFile(), "#$_@GID__INDEX@_$65540$\nroot:x:0:\ncrew:x:70000:alice\n");
-        EXPECT_EQ(test::DescFile(), "crew:old hands\n");
-        EXPECT_NE(::access("/etc/.tavogroup.commit", F_OK), 0);
-        EXPECT_NE(::access("/etc/group_desc.tmp", F_OK), 0);
-    }
-    EXPECT_FALSE(DiesAt(2, change));
-}
 
 using Described = std::map<std::string, std::string>;  // group and members, to its description
 

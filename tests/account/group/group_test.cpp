@@ -141,7 +141,7 @@ TEST(GroupFiles, EveryChangeInTurn)
     EXPECT_EQ(GroupFile(), "#$_@GID__INDEX@_$65537$\nroot:x:0:\nlp:x:7:lp\nusers:x:100:\nadministrators:x:101:admin\n"
                            "Early:x:90000:carol\n");
     EXPECT_EQ(test::DescFile(), "");
-    for (const char *path : {"/etc/group_tmp", "/etc/group_desc.tmp", "/etc/.tavogroup.commit"})
+    for (const char *path : {"/etc/group_tmp", "/etc/group_desc.tmp", "/etc/.tavoaccount.commit"})
         EXPECT_NE(::access(path, F_OK), 0) << path;
 }
 

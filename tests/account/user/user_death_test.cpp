@@ -1,10 +1,9 @@
-// A program that changes accounts dies: at every system call, at random moments, against others. What the next program
+// A program that changes accounts dies at random moments, against others. What the next program
 // finds is the state before or after the change, whole, and no account that was committed is ever lost.
 #include "tavo_user.h"
 
 #include "account/user/user_fixture.h"
 #include "support/rounds.h"
-#include "support/traced_call.h"
 
 #include <gtest/gtest.h>
 
@@ -20,16 +19,9 @@
 #include <set>
 
 using test::AddUser;
-using test::AllFiles;
 using test::GetUser;
 
 namespace {
-
-void RestoreFiles(const std::array<std::string, 4> &files)
-{
-    for (size_t i = 0; i < files.size(); ++i)
-        test::WriteFile(test::kAccountFiles[i], files[i]);
-}
 
 // The accounts that stand in the stores, as any program reads them.
 std::map<std::string, std::string> StoredPasswords()
@@ -57,53 +49,6 @@ void CheckFiles(const std::set<std::string> &committed)
     }
     for (const auto &[name, password] : passwords)
         ASSERT_NE(password, "(none)") << name;
-}
-
-TEST(UserDeath, AtEverySystemCall)
-{
-    if (!test::CanTrace())
-        GTEST_SKIP() << "no ptrace here";
-    for (const char *name : {"alice", "bob", "carol"})
-        ASSERT_EQ(AddUser({.name = name, .password = name}), 0);
-    const auto before = AllFiles();
-    const auto set = [] {
-        const test::User added = test::MakeUser({.name = "dave", .password = "d"});
-        const test::User renamed = test::MakeUser({.name = "robert", .password = "b"});
-        const test::User changed = test::MakeUser({.name = "carol", .password = "new"});
-        const TAVOUSER *users[] = {added.get(), renamed.get(), changed.get()};
-        const char *old_names[] = {nullptr, "bob", "carol"};
-        TAVOUserSet(old_names, users, 3);
-    };
-    const auto remove = [] {
-        const char *const names[] = {"alice", "carol"};
-        TAVOUserDelete(names, 2);
-    };
-    const std::function<void()> works[] = {set, remove};
-    for (const auto &work : works) {
-        RestoreFiles(before);
-        ASSERT_TRUE(GetUser("alice"));
-        work();
-        const auto after = AllFiles();
-        ASSERT_NE(before, after);
-        int calls = 0;
-        int kept = 0;
-        for (int n = 1;; n += test::Stride()) {
-            RestoreFiles(before);
-            ASSERT_TRUE(GetUser("alice"));
-            if (!test::DiesAtCall(n, work))
-                break;
-            ++calls;
-            const bool alice = GetUser("alice") != nullptr;  // opens, and so repairs
-            const auto found = AllFiles();
-            ASSERT_TRUE(found == before || found == after) << "system call " << n;
-            kept += found == after ? 1 : 0;
-            ASSERT_EQ(alice, !test::LineOf("/etc/passwd", "alice").empty());
-            ASSERT_EQ(GetUser("robert") != nullptr, !test::LineOf("/etc/passwd", "robert").empty());
-            CheckFiles(alice ? std::set<std::string>{"alice"} : std::set<std::string>{});
-        }
-        EXPECT_GT(calls, 150 / test::Stride());
-        EXPECT_GT(kept, 10 / test::Stride()) << "deaths behind the point of no return";
-    }
 }
 
 // What the child of the next test has committed and is about to change, in memory that outlives it.

@@ -1,5 +1,5 @@
 // Names in the user lists of Samba's settings file.
-#include "appliance/detail/smb_user_lists.h"
+#include "core/detail/smb_user_lists.h"
 
 #include <gtest/gtest.h>
 

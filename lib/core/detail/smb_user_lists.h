@@ -1,6 +1,6 @@
 // The user lists in Samba's settings file. Pure text.
-#ifndef TAVO_APPLIANCE_DETAIL_SMB_USER_LISTS_H
-#define TAVO_APPLIANCE_DETAIL_SMB_USER_LISTS_H
+#ifndef TAVO_CORE_DETAIL_SMB_USER_LISTS_H
+#define TAVO_CORE_DETAIL_SMB_USER_LISTS_H
 
 #include <functional>
 #include <optional>

@@ -1,0 +1,71 @@
+// Replaces everything that one change touches together: the text files of users and groups, and the neighbours' files in
+// which names stand. Each new file is written and synced beside the old one; then the marker, which names them all and
+// what follows, is made durable, they are moved into place one by one, and the marker goes. A death before the marker leaves
+// the old files, one after it is made good by whoever comes next: never some of each.
+// A file that would become what it is stays. Where only one changes, moving it into place is all or nothing by itself.
+#ifndef TAVO_ACCOUNT_DETAIL_ACCOUNT_COMMIT_H
+#define TAVO_ACCOUNT_DETAIL_ACCOUNT_COMMIT_H
+
+#include "account/detail/commit_marker.h"
+#include "account/detail/store_family.h"
+#include "core/detail/file_rewrite.h"
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace tavo {
+
+// Completes the moves of account files that a dead process left half done, and those of neighbours' files that nobody has
+// changed since. `marker` becomes what is left to do. 0, ERR_READ_FAILED or ERR_RENAME_FAILED.
+int ResumeCommit(Marker &marker);
+
+// The part of that which a reader needs: the account files. The marker stays for the next change when more follows.
+int FinishAccountFiles();
+
+// Removes the temporary files of a family, unless a commit is to be completed with them. 0 or ERR_REMOVE_FAILED.
+int RemoveTemporaries(const StoreFamily &family);
+
+class AccountCommit {
+  public:
+    // `carried`: what is still to be done from earlier, as ResumeCommit left it.
+    explicit AccountCommit(Marker carried = {}) : marker_(std::move(carried)) {}
+    ~AccountCommit();  // what was not committed is removed
+    AccountCommit(const AccountCommit &) = delete;
+    AccountCommit &operator=(const AccountCommit &) = delete;
+
+    // Writes the next generation of an account file, with the owner and mode of the old one. A `target` makes it a
+    // neighbour's file: the group file when users change. 0, ERR_OPEN_FAILED, ERR_WRITE_FAILED or ERR_NOT_ENOUGH_SPACE.
+    int Write(const TextRow &row, std::string_view text, unsigned target = kAccountFile);
+
+    // The same for a neighbour's file that `file` has opened and read. A failure leaves that file out of the commit.
+    int WriteNeighbour(unsigned target, FileRewrite &file, std::string_view text, mode_t mode_of_new);
+
+    // Leaves out the files of a target after all.
+    void Withdraw(unsigned target) noexcept;
+
+    // What follows, for the marker.
+    Marker &Steps() { return marker_; }
+    const Marker &Steps() const { return marker_; }
+
+    // All files must have been written. 0, ERR_WRITE_FAILED or ERR_NOT_ENOUGH_SPACE with nothing moved, or with a single
+    // file moved that may not outlive a power failure; ERR_RENAME_FAILED with nothing moved, or with the rest left to
+    // ResumeCommit. Neighbours' files that could not be moved are pending in the steps.
+    int Commit();
+
+    // To be called when the steps have been taken, as far as they could be: `steps` is what is left. Never fails: a marker
+    // that could not be replaced says to do again what was done, and that does nothing.
+    void Settle() noexcept;
+
+  private:
+    int CommitOne();
+    int CommitAll();
+    bool MoveAll(bool &moved);
+
+    Marker marker_;
+    bool decided_ = false;  // the temporary files belong to the marker
+};
+
+}  // namespace tavo
+
+#endif

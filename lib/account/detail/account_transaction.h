@@ -1,0 +1,76 @@
+// One change of users or groups with everything that follows from it: the locks, the stores, the text files, the files of
+// neighbours, the home folders. What a change that died has left to do is done first.
+#ifndef TAVO_ACCOUNT_DETAIL_ACCOUNT_TRANSACTION_H
+#define TAVO_ACCOUNT_DETAIL_ACCOUNT_TRANSACTION_H
+
+#include "account/detail/account_commit.h"
+#include "account/detail/account_session.h"
+#include "account/detail/follow_up_log.h"
+#include "account/detail/neighbour_files.h"
+#include "account/detail/user_homes.h"
+
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace tavo {
+
+class AccountTransaction {
+  public:
+    // What follows and fails, also of what is left from earlier changes, is logged at `where`.
+    explicit AccountTransaction(const AccountKind &kind, Where where = Where())
+        : kind_(kind), where_(where), session_(kind)
+    {
+    }
+    AccountTransaction(const AccountTransaction &) = delete;
+    AccountTransaction &operator=(const AccountTransaction &) = delete;
+
+    // Takes the locks, all three of the accounts when something is left to do, does it, and opens the stores. The codes of
+    // AccountSession::OpenToChange and ResumeCommit.
+    int Begin(unsigned locks);
+
+    AccountSession &Session() { return session_; }
+
+    // Whether rights of somebody who had this name are still to be taken away: a new account of the name would have them.
+    bool IsPending(bool is_group, const std::string &key) const;
+
+    // What the change is going to do. `targets` of a step: where the name stands.
+    AccountCommit &Files() { return commit_; }
+    NetBackupUsers &Backup()
+    {
+        backup_is_set_ = true;
+        return backup_;
+    }
+
+    // Composes the neighbours' files for the steps in Files(). What cannot be composed is pending.
+    void Compose();
+
+    // Everything at once, then the home folders. A code of AccountCommit::Commit. From 0 on nothing fails any more.
+    int Commit();
+
+    // Gives the locks back, then does what takes its time: folders are removed and copied. False when a lock could not be
+    // released.
+    bool End();
+
+  private:
+    void FinishEarlier();
+    int ComposeMembers(const std::vector<NameStep> &steps);
+    void ComposeOne(unsigned target);
+    void SealGroups();
+    void TakeHomeSteps();
+    void DoWhatTakesTime();
+    void ForgetDone(const std::vector<std::string> &stages, const std::vector<HomeStep> &moved);
+
+    const AccountKind &kind_;
+    const Where where_;
+    AccountSession session_;
+    AccountCommit commit_;
+    NetBackupUsers backup_;
+    bool backup_is_set_ = false;              // with passwords, which no step has
+    std::unique_ptr<AccountSession> groups_;  // when a change of users touches groups
+    std::vector<HomeStep> elsewhere_;
+};
+
+}  // namespace tavo
+
+#endif

@@ -1,0 +1,89 @@
+// The commit marker of the accounts: what a change is going to do, written down before the first file is moved. It names the
+// new files, what becomes of names elsewhere on the appliance, and what becomes of home folders. Who finds it finishes the
+// change; every step can be done twice. One line a step, blanks between the fields:
+//
+//     file account|TARGET TEMPORARY PATH IDENTITY-OF-THE-NEW IDENTITY-OF-THE-OLD
+//     name user|group TARGETS PENDING OLD NEW     NEW empty: deleted. PENDING: targets that no file line stands for
+//     home make|move|remove NAME NEW UID GID INODE
+//     stage FOLDER                                with what is to be removed
+//     end
+//
+// It belongs to root alone, in /etc: it must outlive a restart of the machine. Whoever holds the system's lock on the password
+// files may read and write it.
+#ifndef TAVO_ACCOUNT_DETAIL_COMMIT_MARKER_H
+#define TAVO_ACCOUNT_DETAIL_COMMIT_MARKER_H
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace tavo {
+
+inline constexpr char kCommitMarker[] = "/etc/.tavoaccount.commit";
+
+// Where else on the appliance names of users and groups stand: bits.
+enum Target : unsigned {
+    kAccountFile = 0,
+    kSambaLists = 1,
+    kShareLists = 2,
+    kMemberLists = 4,
+    kFtpList = 8,
+    kBackupUsers = 16,
+    kGuestModule = 32,
+};
+
+// What tells one file from another in its folder: it changes with every change of the file. "-" for one that does not exist.
+std::string FileIdentity(const char *path);
+
+struct FileStep {
+    unsigned target = kAccountFile;
+    std::string temporary;
+    std::string path;
+    std::string made;    // the identity of the temporary file, complete
+    std::string before;  // of the file that it replaces
+};
+
+struct NameStep {
+    bool is_group = false;
+    unsigned targets = 0;
+    unsigned pending = 0;
+    std::string old_name;
+    std::string new_name;  // for kGuestModule: "yes" or "no"
+};
+
+struct HomeStep {
+    enum Kind { kMake, kMove, kRemove } kind = kMake;
+    std::string name;
+    std::string new_name;
+    int32_t uid = -1;
+    int32_t gid = -1;
+    uint64_t inode = 0;  // of the folder that is meant, whatever is called so by now
+};
+
+struct Marker {
+    std::vector<FileStep> files;
+    std::vector<NameStep> names;
+    std::vector<HomeStep> homes;
+    std::vector<std::string> stages;
+
+    bool IsEmpty() const { return files.empty() && names.empty() && homes.empty() && stages.empty(); }
+};
+
+std::string FormatMarker(const Marker &marker);
+bool ParseMarker(std::string_view text, Marker &marker);  // false when it was cut short
+
+bool MarkerStands() noexcept;
+
+// 0, also when there is none or only one that was cut short: that change was not decided, and its marker is gone.
+// ERR_READ_FAILED.
+int ReadMarker(Marker &marker);
+
+// Replaces it; with `durable` it is on the disk afterwards. False with errno, and the old one is as it was.
+bool WriteMarker(const std::string &text, bool durable) noexcept;
+
+void RemoveMarker() noexcept;
+
+}  // namespace tavo
+
+#endif

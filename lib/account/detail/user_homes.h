@@ -1,0 +1,37 @@
+// The home folders of users that are added, renamed and deleted, as steps of a change.
+#ifndef TAVO_ACCOUNT_DETAIL_USER_HOMES_H
+#define TAVO_ACCOUNT_DETAIL_USER_HOMES_H
+
+#include "account/detail/commit_marker.h"
+#include "account/detail/user_batch.h"
+
+#include <span>
+#include <string>
+#include <vector>
+
+namespace tavo {
+
+// The steps for users that were added and renamed: none unless the appliance has home folders. A folder is known by its
+// inode, so that a step that is taken twice, or late, never takes somebody else's.
+void PlanHomes(std::span<const DoneUser> done, Marker &marker);
+
+// The steps for users that are deleted: their folders go to a staging folder on the same volume.
+void PlanRemovals(std::span<const std::string> names, Marker &marker);
+
+enum class HomeResult {
+    kDone,       // also when there is nothing to do any more
+    kFailed,     // errno says why
+    kElsewhere,  // the folder is on another file system: it is moved when nobody waits
+};
+
+// One step by one rename or mkdir.
+HomeResult TakeHomeStep(const HomeStep &step, const std::vector<std::string> &stages);
+
+// What takes its time: moves a folder from another file system, removes a staging folder with what is in it (false when that
+// fails; true when somebody else is at it, with `theirs`).
+bool MoveHomeElsewhere(const HomeStep &step, const std::vector<std::string> &stages);
+bool RemoveStage(const std::string &path, bool &theirs);
+
+}  // namespace tavo
+
+#endif
