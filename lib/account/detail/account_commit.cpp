@@ -179,7 +179,11 @@ int AccountCommit::Write(const TextRow &row, std::string_view text, unsigned tar
     Fd fd = CreateTemporary(row.temporary);
     if (!fd)
         return ERR_OPEN_FAILED;
-    if (!TakeOwnerAndMode(fd.Get(), row) || !WriteAll(fd.Get(), text) || !SyncFd(fd.Get()) || !fd.Close())
+    if (!TakeOwnerAndMode(fd.Get(), row) || !WriteAll(fd.Get(), text) || !SyncFd(fd.Get()))
+        return WriteCode();
+    if (row.path == kUserTextRows[kSmbText].path)
+        samba_.TakeNew(fd.Get());
+    if (!fd.Close())
         return WriteCode();
     marker_.files.back().made = FileIdentity(row.temporary);
     return 0;
@@ -216,6 +220,9 @@ int AccountCommit::Commit()
         std::any_of(marker_.names.begin(), marker_.names.end(), [](const NameStep &name) { return name.pending != 0; });
     if (!follows && marker_.files.empty())
         return 0;
+    // The accounts first: what they are does not depend on what neighbours know of them.
+    std::stable_partition(marker_.files.begin(), marker_.files.end(),
+                          [](const FileStep &file) { return file.target == kAccountFile; });
     return !follows && marker_.files.size() == 1 ? CommitOne() : CommitAll();
 }
 

@@ -7,6 +7,7 @@
 #define TAVO_ACCOUNT_DETAIL_ACCOUNT_COMMIT_H
 
 #include "account/detail/commit_marker.h"
+#include "account/detail/samba_lock.h"
 #include "account/detail/store_family.h"
 #include "core/detail/file_rewrite.h"
 
@@ -44,6 +45,10 @@ class AccountCommit {
     // Leaves out the files of a target after all.
     void Withdraw(unsigned target) noexcept;
 
+    // Samba's lock on its password file: to be taken before that is compared and written, and released when the stamps of
+    // the new one are recorded.
+    SambaLock &Samba() { return samba_; }
+
     // What follows, for the marker.
     Marker &Steps() { return marker_; }
     const Marker &Steps() const { return marker_; }
@@ -63,6 +68,7 @@ class AccountCommit {
     bool MoveAll(bool &moved);
 
     Marker marker_;
+    SambaLock samba_;
     bool decided_ = false;  // the temporary files belong to the marker
 };
 

@@ -88,6 +88,26 @@ int AccountSession::OpenSettled(std::span<const size_t> stores)
     return Open(stores);
 }
 
+int AccountSession::Merge()
+{
+    std::string now = StampTexts(kind_.family);
+    if (now == texts_)
+        return 0;
+    StoreContent content;
+    if (!ReadContent(kind_, content))
+        return ERR_READ_FAILED;
+    for (size_t i = 0; i < stores_.size(); ++i)
+        if (const int code = stores_[i]->TakeOver(content.stores[i]))
+            return code;
+    texts_ = std::move(now);
+    return 0;
+}
+
+bool AccountSession::IsMerged() const
+{
+    return StampTexts(kind_.family) == texts_;
+}
+
 void AccountSession::BeginChange()
 {
     BreakSeal(kind_.family);

@@ -41,6 +41,11 @@ class AccountSession {
     // To be called before the first change of a store: from here to Seal, a death means that they are built anew.
     void BeginChange();
 
+    // The text files win over the stores for whatever this change has not touched: takes over what somebody has changed in
+    // them since the stores were opened. 0, ERR_READ_FAILED or a code of the stores.
+    int Merge();
+    bool IsMerged() const;  // nobody has changed a text file since
+
     // What the end of a change leaves: files that were written from the stores, or, as nothing changed, those from before.
     enum class Texts { kWritten, kAsBefore };
 

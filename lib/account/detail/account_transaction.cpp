@@ -131,6 +131,8 @@ int AccountTransaction::ComposeMembers(const std::vector<NameStep> &steps)
     bool changed = false;
     int code = groups->OpenToChange(TAVO_LOCK_GROUP);
     if (code == 0)
+        code = groups->Merge();
+    if (code == 0)
         code = ChangeMembers(
             *groups,
             [&](const std::string &member) {
@@ -158,6 +160,20 @@ void AccountTransaction::SealGroups()
     groups_->SealWritten();
 }
 
+int AccountTransaction::ComposeAccounts(const std::function<int()> &compose)
+{
+    constexpr int rounds = 5;
+    for (int round = 0; round < rounds; ++round) {
+        int code = session_.Merge();
+        if (code == 0)
+            code = compose();
+        if (code != 0 || session_.IsMerged())
+            return code;
+        commit_.Withdraw(kAccountFile);
+    }
+    return ERR_RENAME_FAILED;
+}
+
 int AccountTransaction::Commit()
 {
     const unsigned before = [&] {
@@ -180,6 +196,7 @@ int AccountTransaction::Commit()
                 LogFollowUp({.target = target, .code = ERR_RENAME_FAILED}, where_);
         if (session_.SealWritten() != 0)
             LogError("%s:%d Failed to close the account stores, errno=%d", errno);
+        commit_.Samba().Release();
         TakeHomeSteps();
     } catch (const std::bad_alloc &) {
         LogError("%s:%d Out of memory, what follows the change is left to the next one");

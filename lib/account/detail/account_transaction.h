@@ -9,6 +9,7 @@
 #include "account/detail/neighbour_files.h"
 #include "account/detail/user_homes.h"
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -44,6 +45,10 @@ class AccountTransaction {
 
     // Composes the neighbours' files for the steps in Files(). What cannot be composed is pending.
     void Compose();
+
+    // Composes the account files by `compose` from stores into which everything is merged that others have changed in the
+    // files meanwhile. Its code; after some rounds ERR_RENAME_FAILED.
+    int ComposeAccounts(const std::function<int()> &compose);
 
     // Everything at once, then the home folders. A code of AccountCommit::Commit. From 0 on nothing fails any more.
     int Commit();

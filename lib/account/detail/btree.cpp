@@ -9,6 +9,7 @@
 #include "core/detail/owner.h"
 
 #include <cstring>
+#include <vector>
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -187,6 +188,16 @@ int Btree::Set(std::string_view key, std::string_view value)
 {
     if (!NoteChange())
         return ERR_DB_STORE;
+    if (const int code = Put(key, value))
+        return code;
+    touched_.emplace(key);
+    if (const auto gone = deleted_.find(key); gone != deleted_.end())
+        deleted_.erase(gone);
+    return 0;
+}
+
+int Btree::Put(std::string_view key, std::string_view value)
+{
     DBT name = Item(key);
     const DBT content = Item(value);
     // Files of the first appliances had duplicate reserved keys; storing over one of them kept the other.
@@ -194,8 +205,32 @@ int Btree::Set(std::string_view key, std::string_view value)
         return CodeOf(errno, ERR_DB_STORE);
     if (Handle(this)->put(Handle(this), &name, &content, 0) != 0)
         return CodeOf(errno, ERR_DB_STORE);
-    if (const auto gone = deleted_.find(key); gone != deleted_.end())
-        deleted_.erase(gone);
+    return 0;
+}
+
+int Btree::TakeOver(const std::map<std::string, std::string, std::less<>> &entries)
+{
+    if (!NoteChange())
+        return ERR_DB_STORE;
+    std::vector<std::string> gone;
+    std::string_view key;
+    std::string_view value;
+    int code;
+    for (Entry which = Entry::kFirst; (code = Walk(which, key, value)) == 0; which = Entry::kNext)
+        if (!entries.contains(key) && !touched_.contains(key) && key.find('\\') == key.npos &&
+            value.find('\\') == value.npos)
+            gone.emplace_back(key);
+    if (code != ERR_DB_END)
+        return code;
+    for (const std::string &each : gone) {
+        const DBT name = Item(each);
+        if (Handle(this)->del(Handle(this), &name, 0) < 0)
+            return CodeOf(errno, ERR_DB_DELETE);
+    }
+    for (const auto &[each, text] : entries)
+        if (!touched_.contains(each) && (Get(each, value) != 0 || value != text))
+            if ((code = Put(each, text)) != 0)
+                return code;
     return 0;
 }
 
@@ -208,6 +243,7 @@ int Btree::Delete(std::string_view key)
     if (result != 0)
         return result > 0 ? ERR_KEY_NOT_FOUND : CodeOf(errno, ERR_DB_DELETE);
     deleted_.emplace(key);
+    touched_.emplace(key);
     return 0;
 }
 

@@ -6,6 +6,7 @@
 #include "account/detail/store_view.h"
 #include "tavo_bdb.h"
 
+#include <map>
 #include <memory>
 #include <set>
 #include <string>
@@ -50,6 +51,9 @@ class Btree : public TAVOBDB, public StoreView {
     int GetNumber(std::string_view key, int32_t &value) const;
     int SetNumber(std::string_view key, int32_t value);
 
+    // Takes over what the text files say by now, except for the keys that were stored or deleted through this handle.
+    int TakeOver(const std::map<std::string, std::string, std::less<>> &entries);
+
     int Flush();  // hands all pages to the file
     int Close();  // Flush and release; ERR_DB_CLOSE
 
@@ -61,9 +65,11 @@ class Btree : public TAVOBDB, public StoreView {
     {
     }
     bool NoteChange();  // false when nothing may be changed
+    int Put(std::string_view key, std::string_view value);
 
     std::string path_;
     std::set<std::string, std::less<>> deleted_;
+    std::set<std::string, std::less<>> touched_;
     bool read_only_;
     bool changed_ = false;
     bool sealed_ = false;  // before our first change, the seal beside the store held for this file

@@ -67,11 +67,13 @@ int ComposeGroups(const TAVOGROUPDB &db, AccountCommit &commit, unsigned target,
 int CommitGroups(AccountTransaction &change, Where where)
 {
     GroupDumpReport report;
-    int code = ComposeGroups(GroupDb(change.Session()), change.Files(), kAccountFile, report);
-    if (code == 0) {
-        change.Compose();
+    change.Compose();
+    int code = change.ComposeAccounts([&] {
+        report = {};
+        return ComposeGroups(GroupDb(change.Session()), change.Files(), kAccountFile, report);
+    });
+    if (code == 0)
         code = change.Commit();
-    }
     if (code == 0)
         return 0;
     if (report.not_opened)

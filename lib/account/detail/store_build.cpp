@@ -18,24 +18,6 @@
 namespace tavo {
 namespace {
 
-// False when a text file is there but cannot be read.
-bool ReadContent(const AccountKind &kind, StoreContent &out)
-{
-    const StoreFamily &family = kind.family;
-    std::vector<std::string> texts(family.texts.size());
-    out.sync_times.resize(family.stores.size());
-    for (size_t i = 0; i < texts.size(); ++i) {
-        int64_t time = 0;
-        if (!ReadTextFile(family.texts[i].path, texts[i], time))
-            return false;
-        for (size_t store = 0; store < family.stores.size(); ++store)
-            if (std::strcmp(family.stores[store].text, family.texts[i].path) == 0)
-                out.sync_times[store] = time;
-    }
-    out.stores = kind.entries(texts);
-    return true;
-}
-
 struct CloseFolder {
     void operator()(DIR *folder) const noexcept { ::closedir(folder); }
 };
@@ -136,6 +118,23 @@ bool MoveIntoPlace(const char *built, const StoreRow &row)
 }
 
 }  // namespace
+
+bool ReadContent(const AccountKind &kind, StoreContent &out)
+{
+    const StoreFamily &family = kind.family;
+    std::vector<std::string> texts(family.texts.size());
+    out.sync_times.resize(family.stores.size());
+    for (size_t i = 0; i < texts.size(); ++i) {
+        int64_t time = 0;
+        if (!ReadTextFile(family.texts[i].path, texts[i], time))
+            return false;
+        for (size_t store = 0; store < family.stores.size(); ++store)
+            if (std::strcmp(family.stores[store].text, family.texts[i].path) == 0)
+                out.sync_times[store] = time;
+    }
+    out.stores = kind.entries(texts);
+    return true;
+}
 
 int BuildStores(const AccountKind &kind, std::string &texts)
 {

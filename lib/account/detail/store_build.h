@@ -17,6 +17,9 @@ struct AccountKind {
     std::vector<StoreEntries> (*entries)(std::span<const std::string> texts);  // what the text files make of the stores
 };
 
+// What the text files make of the stores. False when one is there but cannot be read.
+bool ReadContent(const AccountKind &kind, StoreContent &out);
+
 // Completes a half-done commit, reads the text files and puts new stores in place of the old ones, whatever those are;
 // old ones that were root's and hold no secrets are kept as "NAME.bak". The locks must be held exclusively.
 // `texts` becomes what the text files looked like when they were read.

@@ -12,6 +12,8 @@ namespace {
 
 using tavo::DumpReport;
 
+constexpr int kLockSeconds = 5;
+
 // Accounts of the system have no Samba password and no privileges: nothing that needs looking after.
 void LogMissing(const DumpReport &report)
 {
@@ -35,12 +37,17 @@ int FailUserDump(int code, const DumpReport &report)
 int tavo::CommitUsers(AccountTransaction &change)
 {
     DumpReport report;
-    int code = ComposeUsers(UserDb(change.Session()), change.Files(), report);
-    LogMissing(report);
+    int code = change.Files().Samba().Take(kLockSeconds);
     if (code == 0) {
         change.Compose();
-        code = change.Commit();
+        code = change.ComposeAccounts([&] {
+            report = {};
+            return ComposeUsers(UserDb(change.Session()), change.Files(), report);
+        });
     }
+    LogMissing(report);
+    if (code == 0)
+        code = change.Commit();
     return code == 0 ? 0 : FailUserDump(code, report);
 }
 
@@ -54,7 +61,9 @@ extern "C" int TAVOUserDBDump(TAVOUSERDB *pDb)
         if (const int code = tavo::ResumeCommit(earlier))
             return FailUserDump(code, report);
         tavo::AccountCommit commit(std::move(earlier));
-        int code = tavo::ComposeUsers(*pDb, commit, report);
+        int code = commit.Samba().Take(kLockSeconds);
+        if (code == 0)
+            code = tavo::ComposeUsers(*pDb, commit, report);
         LogMissing(report);
         if (code == 0)
             code = commit.Commit();

@@ -13,6 +13,7 @@
 #include <dlfcn.h>
 #include <fcntl.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -39,6 +40,9 @@ struct Fault {
 // What somebody else does at the next rename of the library's.
 std::function<void()> meanwhile;
 
+// And at the next wait for the disk, when the new files have been composed from what the old ones said.
+std::function<void()> at_sync;
+
 int syncs = 0;  // how often the library waited for the disk
 
 bool Fails(const char *function)
@@ -62,6 +66,8 @@ extern "C" {
 int fsync(int fd)
 {
     ++syncs;
+    if (const auto act = std::exchange(at_sync, nullptr))
+        act();
     return Fails("fsync") ? -1 : Next<int(int)>("fsync")(fd);
 }
 
@@ -246,6 +252,102 @@ TEST(UserStore, EditsWhileTheStoresAreBuilt)
     ExternalEdit("/etc/passwd", "ext3:x:902:100::/:/bin/sh");
     EXPECT_EQ(TAVOBDbClose(names), 0);
     EXPECT_TRUE(GetUser("ext3"));
+}
+
+// Somebody changes the files while a change of ours is under way, without the system's lock: whatever ours does not touch
+// stays as he has written it.
+TEST(UserStore, EditsWhileOthersAreChanged)
+{
+    ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
+    ASSERT_EQ(AddUser({.name = "bob", .password = "x"}), 0);
+    const auto edit = [](const char *path, const std::string &from, const std::string &to) {
+        std::string text = test::FileText(path);
+        const size_t at = text.find(from);
+        ASSERT_NE(at, text.npos) << path;
+        test::WriteFile(path, text.replace(at, from.size(), to));
+    };
+    for (const char *name : {"carol", "dave"}) {
+        at_sync = [&] {
+            edit("/etc/passwd", "/homes/alice:", "/elsewhere/alice:");
+            edit("/etc/shadow", "alice:$1$", "alice:$1$new");
+            ExternalEdit("/etc/passwd", std::string("ext_") + name + ":x:901:100::/:/bin/sh");
+            ExternalEdit("/etc/shadow", std::string("ext_") + name + ":*:1:0:99999:7:::");
+        };
+        EXPECT_EQ(AddUser({.name = name}), 0);
+        ASSERT_FALSE(at_sync);
+        edit("/etc/passwd", "/elsewhere/alice:", "/homes/alice:");
+        edit("/etc/shadow", "alice:$1$new", "alice:$1$");
+    }
+    for (const char *name : {"carol", "dave", "ext_carol", "ext_dave", "bob"}) {
+        EXPECT_NE(test::LineOf("/etc/passwd", name), "") << name;
+        EXPECT_NE(test::LineOf("/etc/shadow", name), "") << name;
+        EXPECT_TRUE(GetUser(name)) << name;
+    }
+    // Somebody who never stops is told from one who can be waited for: nothing has changed then.
+    const std::function<void()> forever = [&] {
+        ExternalEdit("/etc/passwd", "x" + std::to_string(syncs) + ":x:902:100::/:/bin/sh");
+        at_sync = forever;
+    };
+    at_sync = forever;
+    EXPECT_EQ(AddUser({.name = "erin"}), ERR_RENAME_FAILED);
+    at_sync = nullptr;
+    EXPECT_EQ(test::LineOf("/etc/passwd", "erin"), "");
+    EXPECT_EQ(AddUser({.name = "erin"}), 0);
+}
+
+// Samba's own programs change hashes in place, under a lock on the file. What they have reported as done stays.
+TEST(UserStore, SambaChangesItsFileMeanwhile)
+{
+    const char *path = "/usr/tavo/etc/private/smbpasswd";
+    ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
+    ASSERT_EQ(AddUser({.name = "bob", .password = "x"}), 0);
+    const auto hash_of = [&](int round) {
+        char hash[33];
+        std::snprintf(hash, sizeof hash, "%032X", 1000 + round);
+        return std::string(hash);
+    };
+    const int rounds = test::Rounds(800);
+    const pid_t samba = ::fork();
+    if (samba == 0) {
+        for (int round = 0; round < rounds; ++round) {
+            for (;;) {
+                const int fd = ::open(path, O_RDWR | O_CLOEXEC);
+                struct flock lock = {};
+                lock.l_type = F_WRLCK;
+                struct stat held;
+                struct stat named;
+                if (fd < 0 || ::fcntl(fd, F_SETLKW, &lock) != 0)
+                    ::_exit(1);
+                if (::fstat(fd, &held) != 0 || ::stat(path, &named) != 0 || held.st_ino != named.st_ino) {
+                    ::close(fd);
+                    continue;  // it was replaced while we waited
+                }
+                const std::string text = test::FileText(path);
+                const size_t at = text.find("alice:");
+                const size_t hash = text.find(':', text.find(':', text.find(':', at) + 1) + 1) + 1;
+                const std::string old = text.substr(hash, 32);
+                if (round > 0 && old != hash_of(round - 1))
+                    ::_exit(2);  // what was done before is gone
+                if (::pwrite(fd, hash_of(round).data(), 32, off_t(hash)) != 32)
+                    ::_exit(3);
+                ::close(fd);
+                ::usleep(useconds_t(round % 7 * 1000));
+                break;
+            }
+        }
+        ::_exit(0);
+    }
+    int status = -1;
+    int changes = 0;
+    for (; ::waitpid(samba, &status, WNOHANG) == 0; ++changes) {
+        const std::string name = "u" + std::to_string(changes);
+        ASSERT_EQ(AddUser({.name = name}), 0);
+        ASSERT_EQ(test::DeleteUser(name), 0);
+    }
+    EXPECT_EQ(status, 0) << "1: no lock, 2: a change of Samba's was lost";
+    EXPECT_GT(changes, 0);
+    ASSERT_EQ(AddUser({.name = "last"}), 0);
+    EXPECT_NE(test::LineOf(path, "alice").find(hash_of(rounds - 1)), std::string::npos);
 }
 
 // Accounts that share a user id, differ in case only, or have ids beyond the index survive every rewrite.

@@ -1,0 +1,31 @@
+// The lock that Samba's own programs take on its password file while they change it in place.
+#ifndef TAVO_ACCOUNT_DETAIL_SAMBA_LOCK_H
+#define TAVO_ACCOUNT_DETAIL_SAMBA_LOCK_H
+
+#include "core/detail/owner.h"
+
+namespace tavo {
+
+// Excludes whoever locks the file as a process (smbd, smbpasswd), and belongs to the open file: no other close in this
+// process drops it. Tries until `seconds` have passed.
+bool LockOpenFile(int fd, int seconds) noexcept;
+
+class SambaLock {
+  public:
+    // Locks the file that has the name when the lock is held: a program that waited for a file which was replaced meanwhile
+    // opens the new one, and so do we. 0, also when there is no such file; ERR_LOCK_FAILED.
+    int Take(int seconds) noexcept;
+
+    // The new file, before it gets the name: nobody changes it until its time stamps are recorded.
+    void TakeNew(int fd) noexcept;
+
+    void Release() noexcept;
+
+  private:
+    Fd old_;
+    Fd new_;
+};
+
+}  // namespace tavo
+
+#endif
