@@ -51,7 +51,8 @@ TAVO_API int TLIBFileGetKeyValue(const char *szPath, const char *szKey, char *sz
 /* Sets szKey to szValue by a safe rewrite: the first line of the key is replaced, later ones are dropped, and a key
  * that is not there is appended. A file that does not exist is created with that one line and the mode that the umask
  * leaves. Returns 1, or -1 with ERR_BAD_PARAMETERS (a NULL argument other than szFormat, or see above) or a code of a
- * rewrite. */
+ * rewrite.
+ * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileSetKeyValue(const char *szPath, const char *szKey, const char *szValue, const char *szFormat);
 
 /* Appends szKey in place, without a rewrite, unless a line sets it already. A file that does not exist is created.
@@ -66,7 +67,8 @@ TAVO_API int TLIBFileAppendKey(const char *szPath, const char *szKey, const char
 
 /* Removes every line of szKey by a safe rewrite.
  * Returns 1, 0 with ERR_KEY_NOT_FOUND and the file untouched, or -1 with ERR_BAD_PARAMETERS (a NULL argument) or a code
- * of a rewrite. */
+ * of a rewrite.
+ * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileRemoveKey(const char *szPath, const char *szKey);
 
 /* Reads many values into the caller's hash *ppshHash, which may move. A line is split at any byte of szSep ("=", or
@@ -82,7 +84,8 @@ TAVO_API int TLIBFileGetKeys(const char *szPath, const TLIBSZLIST *pslKeys, TLIB
 /* Sets every pair of pshPairs in one safe rewrite: the first line of each key is replaced, its later ones are dropped,
  * and the keys that are not there are appended in the hash's slot order. A file that does not exist is created. The
  * hash is not changed. Returns 1, or -1 with ERR_BAD_PARAMETERS (szPath or pshPairs is NULL, or see above) or a code of
- * a rewrite. */
+ * a rewrite.
+ * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileSetKeys(const char *szPath, const TLIBSZHASH *pshPairs, const char *szFormat);
 
 /*
@@ -104,12 +107,14 @@ TAVO_API int TLIBFileGetLineByKey(const char *szPath, const char *szKey, char *s
 
 /* Replaces a line by a safe rewrite.
  * Both return 1, 0 with ERR_KEY_NOT_FOUND (no such line) and the file untouched, or -1 with ERR_BAD_PARAMETERS (a NULL
- * argument, lineNo below 1, a newline inside szLine) or a code of a rewrite. */
+ * argument, lineNo below 1, a newline inside szLine) or a code of a rewrite.
+ * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileSetLine(const char *szPath, int lineNo, const char *szLine);
 TAVO_API int TLIBFileSetLineByKey(const char *szPath, const char *szKey, const char *szLine);
 
 /* Inserts a line before line lineNo (0: after the last one), or before the first line that sets szKey, by a safe
- * rewrite. Results as of TLIBFileSetLine; lineNo below 0 is ERR_BAD_PARAMETERS. */
+ * rewrite. Results as of TLIBFileSetLine; lineNo below 0 is ERR_BAD_PARAMETERS.
+ * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileAddLine(const char *szPath, int lineNo, const char *szLine);
 TAVO_API int TLIBFileAddLineByKey(const char *szPath, const char *szKey, const char *szLine);
 
@@ -127,12 +132,15 @@ TAVO_API int TLIBFileReadLines(const char *szPath, TLIBSZLIST **ppslLines);
 /* Puts ";" in front of every line that sets szKey. The new text is made in /etc/skel/tempErrTLIBFileComment when that
  * lies on the same file system and nothing else stands there, else as any other rewrite.
  * Returns 1, 0 with ERR_KEY_NOT_FOUND and the file untouched, or -1 with ERR_BAD_PARAMETERS (a NULL argument) or a code
- * of a rewrite. */
+ * of a rewrite.
+ * Files: /etc/skel/tempErrTLIBFileComment (created and renamed)
+ * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileComment(const char *szPath, const char *szKey);
 
 /* Replaces szOld by szNew wherever it stands in a line, from left to right, by a safe rewrite.
  * Returns the number of replacements (0: the file is untouched), or -1 with ERR_BAD_PARAMETERS (a NULL argument, an
- * empty szOld, a newline in either text) or a code of a rewrite. */
+ * empty szOld, a newline in either text) or a code of a rewrite.
+ * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileReplaceSubStr(const char *szPath, const char *szOld, const char *szNew);
 
 /* Creates a file of mode 0600 whose name is szTemplate with its last six characters, which must be "XXXXXX", made
@@ -153,7 +161,8 @@ TAVO_API int TLIBFileTouch(const char *szPath);
 
 /* Removes a leading UTF-8 byte-order mark by a safe rewrite.
  * Returns 1 when there was one, 0 when there was none (no code, the file is untouched), or -1 with ERR_BAD_PARAMETERS
- * (NULL) or a code of a rewrite. */
+ * (NULL) or a code of a rewrite.
+ * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileUTF8BomStrip(const char *szPath);
 
 /* Returns 1 when the first line that sets szKey sets it to szValue, byte for byte. Returns 0 when it sets another value
@@ -166,7 +175,10 @@ TAVO_API int TLIBILineKeyMatch(const char *szLine, const char *szKey);
 
 /* Sets a key of /etc/tavoinfo.conf, the system settings file, as TLIBFileSetKeyValue does with the default format,
  * while it holds that file's lock (0x800, exclusive; waits at most 5 seconds for it). Returns 1, or -1 with
- * ERR_LOCK_FAILED or a code of TLIBFileSetKeyValue. */
+ * ERR_LOCK_FAILED or a code of TLIBFileSetKeyValue.
+ * Files: /etc/tavoinfo.conf (rewritten)
+ * Locks: TAVO_LOCK_TAVOINFO (exclusive, at most 5 s)
+ * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TAVOINFOSetKeyValue(const char *szKey, const char *szValue);
 
 TAVO_END_DECLS

@@ -17,6 +17,8 @@
  *
  * Anyone who may log in to the appliance may read the lock files and so hold up those who change settings; the lock
  * files guard against accidents among the appliance's own programs.
+ *
+ * Files: /tmp/lock/lock_* (created, locked)
  */
 #ifndef TAVO_LOCK_H
 #define TAVO_LOCK_H

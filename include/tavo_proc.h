@@ -20,7 +20,8 @@ TAVO_BEGIN_DECLS
 
 /* Runs a command line through the shell, as system(3), with the caller's environment. Never pass text that came from
  * outside the program: the shell takes it for commands.
- * Returns what system(3) returns, a wait status and no exit code; 0 for NULL, without running anything. Sets no code. */
+ * Returns what system(3) returns, a wait status and no exit code; 0 for NULL, without running anything. Sets no code.
+ * Runs: /bin/sh */
 TAVO_API int TLIBSystem(const char *szCommand);
 
 /* Runs a program and waits for its end. After szProgram follow its arguments (const char *), at most four, the list ended
@@ -94,7 +95,9 @@ TAVO_API int BlTLIBProcAlive(pid_t pid);
  * Returns how many processes match, which may exceed nPid, or -1 with
  *   ERR_BAD_PARAMETERS  szPattern is NULL, or rgPid is NULL with nPid above 0
  *   ERR_READ_FAILED     the scratch file cannot be created (something of another owner is in its place) or opened again
- *   ERR_OUT_OF_MEMORY */
+ *   ERR_OUT_OF_MEMORY
+ * Files: /tmp/tempTLIBPs* (created and removed)
+ * Runs: /bin/ps, /bin/grep */
 TAVO_API int TLIBPs(const char *szPattern, pid_t *rgPid, int nPid);
 
 /* Removes a file; of a symbolic link, the link. Directories are refused.

@@ -34,7 +34,8 @@ TAVO_API int TLIBFileGetSection(const char *szPath, const char *szSection, TLIBS
  * name stays) and the pairs of pshPairs; with flags 0 they are removed. Comment lines of the body stay, after the new
  * pairs. A section that is not there is not added.
  * Returns 1, 0 with ERR_KEY_NOT_FOUND when no such section was found (the file is rewritten all the same), or -1 with
- * ERR_BAD_PARAMETERS (szPath, szSection or pshPairs is NULL, or what cannot be written) or a code of a rewrite. */
+ * ERR_BAD_PARAMETERS (szPath, szSection or pshPairs is NULL, or what cannot be written) or a code of a rewrite.
+ * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int ErrTLIBFileSetSection(const char *szPath, const char *szSection, const char *szNewName,
                                    const TLIBSZHASH *pshPairs, int flags, const char *szFormat);
 
@@ -56,7 +57,8 @@ TAVO_API int ErrTLIBFileAddSection(const char *szPath, const char *szSection, co
 /* Removes every section szSection: its header and body. The comment lines of the body stay and so belong to the section
  * before it.
  * Returns 1, 0 with ERR_KEY_NOT_FOUND when no such section was found (the file is rewritten all the same), or -1 with
- * ERR_BAD_PARAMETERS (a NULL argument) or a code of a rewrite. */
+ * ERR_BAD_PARAMETERS (a NULL argument) or a code of a rewrite.
+ * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int ErrTLIBFileRemoveSection(const char *szPath, const char *szSection);
 
 /* Returns 1 when the line of length bytes is a section header, else 0; with ERR_BAD_PARAMETERS when szLine is NULL. */
@@ -66,7 +68,8 @@ TAVO_API int TLIBIFileIsSection(const char *szLine, int length);
  * szLine or szSection is NULL. */
 TAVO_API int TLIBIFileMatchSection(const char *szLine, int length, const char *szSection);
 
-/* The rewrite behind Set and Remove: as ErrTLIBFileSetSection, but pshPairs may be NULL when flags is 0. */
+/* The rewrite behind Set and Remove: as ErrTLIBFileSetSection, but pshPairs may be NULL when flags is 0.
+ * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBIFileModifySection(const char *szPath, const char *szSection, const char *szNewName,
                                     const TLIBSZHASH *pshPairs, int flags, const char *szFormat);
 

@@ -4,6 +4,8 @@
  * The tables are compiled in and constant. All state lives elsewhere: the enable keys in /etc/tavoinfo.conf, the
  * capabilities of the model in /etc.defaults/tavoinfo.conf, the data folders behind the links under /var/services, and
  * the daemons themselves, which the scripts under /usr/tavo/etc/rc.d/ start and stop.
+ *
+ * Files: /etc/tavoinfo.conf, /etc.defaults/tavoinfo.conf, /usr/tavo/etc/share.conf, /var/services
  */
 #ifndef TAVO_SERVICE_H
 #define TAVO_SERVICE_H
@@ -186,7 +188,9 @@ TAVO_API int TAVOServiceDataSearch(int idShare, char *szVolume, int cbVolume);
 TAVO_API int TAVOServiceActionSet(int id, int action);
 
 /* The standard handlers: of the action (see TAVOServiceActionSet), and of the status. A service counts as enabled unless
- * its key is "no"; the status holds the settings lock (0x805, at most 5 s) for the look at the key. */
+ * its key is "no"; the status holds the settings lock (0x805, at most 5 s) for the look at the key.
+ * Runs: /usr/tavo/etc/rc.d
+ * Locks: TAVO_LOCK_TAVOINFO */
 TAVO_API int TAVOServiceSTDAction(const TAVOSERVICE *pService, int action);
 TAVO_API int TAVOServiceSTDStatus(const TAVOSERVICE *pService);
 
@@ -214,7 +218,9 @@ TAVO_API int TAVOServiceiTunesStatus(const TAVOSERVICE *pService);
  * started again.
  * Returns the bits whose commands succeeded (0x40000000 stands for the system web server), 0 when none did, or -1 with
  *   ERR_BAD_PARAMETERS  no daemon or no such operation
- *   ERR_LOCK_FAILED     another process is switching services, or changing one of those files */
+ *   ERR_LOCK_FAILED     another process is switching services, or changing one of those files
+ * Runs: /usr/tavo/etc/rc.d
+ * Locks: TAVO_LOCK_TAVOINFO, TAVO_LOCK_SMB, TAVO_LOCK_APPLE */
 TAVO_API int TAVONetService(uint32_t fDaemon, int operation);
 
 /* Sets the enable key of data folder idShare to "no" and nothing else. Returns 0 or -1. */
@@ -226,7 +232,9 @@ TAVO_API int TAVOServiceOnOffALL(int fOn);
 
 /* Runs the start-up scripts of installed packages (/usr/tavo/etc/rc.d/packages, in the order of their names, backwards
  * for "stop") with the argument "start", "stop" or "restart". Returns the number of scripts that succeeded, or -1 with
- * ERR_BAD_PARAMETERS. */
+ * ERR_BAD_PARAMETERS.
+ * Files: /usr/tavo/etc/rc.d/packages (read)
+ * Runs: /usr/tavo/etc/rc.d/packages */
 TAVO_API int TAVOServiceThirdPartyAll(const char *szAction);
 
 /*

@@ -90,6 +90,10 @@ class ManualPages(unittest.TestCase):
         self.assertIn(".B ERR_LOCK_FAILED\na lock was not free", errors)             # that of its header
         self.assertIn(".B ERR_INVALID_NETNAME", self.section("BlTLIBIsIpAddr", "ERRORS"))  # that of its section
         self.assertIn("(/sys cannot be searched)"[1:-1], self.section("TAVOEBoxInfoEnum", "ERRORS"))  # in brackets
+        self.assertIn(".B ERR_RENAME_FAILED\nthe new file could not take the old one",
+                      self.section("TLIBFileSetKeyValue", "ERRORS"))                 # in a fixed line
+        self.assertIn("TAVO_LOCK_SMB", self.section("TAVONetService", "LOCKS"))
+        self.assertIn("/usr/tavo/etc/rc.d", self.section("TAVONetService", "PROGRAMS"))
         self.assertNotIn("ERR_NO_SUCH_USER", self.section("TAVOUserGet", "RETURN VALUE"))
         self.assertIn("/etc/shadow", self.section("TAVOUserSet", "FILES"))
 

@@ -68,7 +68,7 @@ def manual_page(entry, page, version):
         out += [".SH ERRORS"]
         if page.errors:
             for code, said in page.errors:
-                out += [".TP", f".B {code}", _escape(said) if said else "See RETURN VALUE."]
+                out += [".TP", f".B {code}", _escape(said)]
         else:
             out += ["This function names no code of its own; see DESCRIPTION."]
     if page.runs:

@@ -96,7 +96,11 @@ def _errors(entry, known):
             if entry.returns != "void" and _SHARED.search(shared.text):
                 for code, said in _table(shared.text).items():
                     errors.setdefault(code, said)
-    return [(code, said or (known[code][1] if code in known else "")) for code, said in errors.items() if code != "ERR_"]
+    # Where the comment names a code alone, the header's own table explains it, else the code's remark or its name.
+    family = _table(entry.family.intro.text) if entry.kind == "function" else {}
+    return [(code, said or family.get(code) or known.get(code, ("", ""))[1] or
+             code.removeprefix("ERR_").lower().replace("_", " ") + "; see RETURN VALUE")
+            for code, said in errors.items() if code != "ERR_"]
 
 
 def _files(entry):
