@@ -217,6 +217,27 @@ TEST_F(MachineUsedDisks, AllOfALargeDiskIsUsed)
     EXPECT_EQ(Told("ls /sys/block/sda | grep -c sda || true"), "0\n");
 }
 
+TEST_F(MachineUsedDisks, SomebodysStickStaysAsItIs)
+{
+    test::Happen("plug usb --blank");
+    const std::string stick = Told("for block in /sys/block/sd*; do "
+                                   "case $(readlink -f $block) in */usb*) echo -n /dev/${block##*/};; esac; done");
+    ASSERT_THAT(stick, testing::StartsWith("/dev/sd"));
+    // A group that is not active, over nothing but the stick, and a stray physical volume on a disk.
+    Told("pvcreate -q -ff -y " + stick + " && vgcreate -q vg9 " + stick +
+         " && lvcreate -q -W n -l100%VG -n lv vg9 && " +
+         "mkfs.ext4 -q /dev/vg9/lv && vgchange -q -an vg9 && pvcreate -q -ff -y /dev/sdb && sync");
+    const std::string before = Told("blockdev --flushbufs " + stick + "; sha256sum " + stick);
+    EXPECT_EQ(LVMCleanIllegal(), 0);
+    ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .sync = false}), 0)
+        << "the stray one is gone";
+    EXPECT_EQ(RAIDRemove(ReadArray("/dev/md2").get()), 0);
+    EXPECT_EQ(PartitionClean("/dev/sda", PARTITION_SYSTEM | PARTITION_DATA), 0);
+    EXPECT_EQ(Told("blockdev --flushbufs " + stick + "; sha256sum " + stick), before);
+    EXPECT_EQ(Told("pvs --noheadings -o vg_name " + stick), "  vg9 \n");
+    test::Happen("pull usb");
+}
+
 // Sectors of 4,096 bytes: every geometry of ours counts in 512.
 TEST_F(MachineUsedDisks, OtherSectorsAreRefusedBeforeAnythingIsWritten)
 {

@@ -28,6 +28,9 @@ FAULT = re.compile(r'Kernel panic|Oops|BUG:|kernel BUG at|Internal error:|Unable
                    r'|refcount_t:|list_(add|del) corruption|blocked for more than|Bad page state')
 
 
+STICK = 99  # its number among the emulator's files: beyond all bays
+
+
 class Died(Exception):
     """The machine ended, or stopped answering, in the middle of a job."""
 
@@ -232,6 +235,13 @@ class Machine:
                         f'driver=raw,node-name=disk{bay},discard=unmap,cache.no-flush=on,file.driver=file,'
                         f'file.filename=/dev/fdset/{bay},file.locking=off,file.discard=unmap',
                         '-device', json.dumps(self._bay(bay))]
+        # What "plug usb" plugs in.
+        self.stick = tempfile.TemporaryFile(prefix='tavo-disk.')
+        self.stick.truncate(hardware.size << 20)
+        inherited.append(self.stick.fileno())
+        command += ['-device', 'qemu-xhci,id=usb', '-add-fd', f'fd={self.stick.fileno()},set={STICK}', '-blockdev',
+                    f'driver=raw,node-name=stick,cache.no-flush=on,file.driver=file,file.filename=/dev/fdset/{STICK},'
+                    'file.locking=off']
         if incoming:
             command += ['-incoming', 'defer']
         # In a group of its own: an interrupt at the terminal is for us, who then end the machine.
@@ -396,6 +406,14 @@ class Machine:
     def _happen(self, verb, what, how='', size=''):
         if verb in ('cut', 'restore') and what in ('eth0', 'eth1'):
             self.monitor('set_link', name=what, up=verb == 'restore')
+        elif verb == 'plug' and what == 'usb':
+            if how == 'blank':
+                self.stick.truncate(0)
+                self.stick.truncate(self.hardware.size << 20)
+            self.monitor('device_add', driver='usb-storage', id='stick', bus='usb.0', drive='stick', serial='STICK1')
+        elif verb == 'pull' and what == 'usb':
+            self.monitor('device_del', id='stick')
+            self.monitor.wait_for('DEVICE_DELETED', 'stick')
         elif verb in ('pull', 'plug', 'blank') and what.isdigit() and 1 <= int(what) <= self.hardware.disks:
             bay, hot = int(what), self.hardware.bus == 'scsi'
             if verb == 'pull' and hot:
