@@ -101,7 +101,7 @@ TEST_F(MachineUsedDisks, NoOldArrayComesBackAfterCleaning)
         Partition(bay);
     }
     Shell("mdadm -A --scan");
-    EXPECT_THAT(Told("cat /proc/mdstat"), testing::Not(HasSubstr("raid1")));
+    EXPECT_THAT(Told("cat /proc/mdstat"), testing::Not(HasSubstr("active")));
     for (const char *member : {"/dev/sda1", "/dev/sda2", "/dev/sda3", "/dev/sdb2"}) {
         RAIDSUPERBLOCK superblock;
         EXPECT_EQ(RAIDSBGet(member, &superblock), 0) << member;
@@ -234,7 +234,7 @@ TEST_F(MachineUsedDisks, SomebodysStickStaysAsItIs)
     EXPECT_EQ(RAIDRemove(ReadArray("/dev/md2").get()), 0);
     EXPECT_EQ(PartitionClean("/dev/sda", PARTITION_SYSTEM | PARTITION_DATA), 0);
     EXPECT_EQ(Told("blockdev --flushbufs " + stick + "; sha256sum " + stick), before);
-    EXPECT_EQ(Told("pvs --noheadings -o vg_name " + stick), "  vg9 \n");
+    EXPECT_EQ(Told("pvs --noheadings -o vg_name " + stick), "  vg9\n");
     test::Happen("pull usb");
 }
 
