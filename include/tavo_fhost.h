@@ -67,7 +67,8 @@ typedef int (*TAVOFHOSTCALLBACK)(const TAVOFHOST *pHost, void *pContext);
  * that any number of callers can search at the same time. Hosts that have answered another query in the last 15 s are
  * among those that come first.
  * Returns the number of hosts that were handed over, or -1 with ERR_BAD_PARAMETERS (pfnHost is NULL, cSeconds below 1),
- * ERR_OP_FAILURE (the daemon does not start, or an interface could not send) or ERR_OUT_OF_MEMORY. */
+ * ERR_OP_FAILURE (the daemon does not start, or an interface could not send and nobody answered on the others) or
+ * ERR_OUT_OF_MEMORY. */
 TAVO_API int TAVOFHOSTEnum(TAVOFHOSTCALLBACK pfnHost, void *pContext, int cSeconds);
 
 TAVO_END_DECLS

@@ -182,8 +182,8 @@ TAVO_API int TAVOIIpConflict(const char *szInterface, const char *szAddr);
 /* 1 when the cable of the interface has something at its other end, else 0. */
 TAVO_API int BlTLIBIsConnected(const char *szInterface);
 
-/* 1 when a TCP or UDP socket over IPv4 has the local port (1 to 65535; /proc/net/tcp, /proc/net/udp), else 0; also 0 with
- * ERR_BAD_PARAMETERS or ERR_OPEN_FAILED. */
+/* 1 when a TCP or UDP socket has the local port (1 to 65535; /proc/net/tcp, /proc/net/udp, and tcp6 and udp6 beside them
+ * where the kernel has IPv6), else 0; also 0 with ERR_BAD_PARAMETERS or ERR_OPEN_FAILED. */
 TAVO_API int BlTLIBIsPortInUse(int port);
 
 /* Adds or removes the route to a network behind an interface, which may be the dial-up one, ppp0. Return 0, or -1 with

@@ -37,24 +37,13 @@ std::string BootId()
 // fixed.
 constexpr size_t kLongestCommand = 300;
 
-std::string CommandLine(pid_t pid, std::string_view command)
+std::string CommandLine(pid_t pid, const std::string &beginning, std::string_view command)
 {
-    const std::string beginning = pid > 0 ? BeginningOf(pid) : "-";
     const std::string text(command.substr(0, std::min(command.find(" >"), kLongestCommand)));
     char line[400];
     std::snprintf(line, sizeof line, "command %10d %20s %-*s\n", static_cast<int>(pid), beginning.c_str(),
                   static_cast<int>(kLongestCommand), text.c_str());
     return line;
-}
-
-void KillProcess(pid_t pid, std::string_view beginning)
-{
-    if (pid <= 0 || beginning.empty() || BeginningOf(pid) != beginning)
-        return;
-    ::kill(pid, SIGKILL);
-    constexpr int rounds = 100;
-    for (int i = 0; i < rounds && BeginningOf(pid) == beginning && !IsZombie(pid); ++i)
-        ::usleep(10000);
 }
 
 pid_t ToPid(std::string_view text)
@@ -70,14 +59,18 @@ void KillCommand(std::string_view line)
     const auto field = SplitFields(line);
     if (field.size() < 3 || field[0] != "command")
         return;
-    KillProcess(ToPid(field[1]), field[2]);
+    EndProcess(ToPid(field[1]), field[2]);
     if (field.size() == 3)
         return;
     std::string_view text = line.substr(static_cast<size_t>(field[3].data() - line.data()));
     text = text.substr(0, text.find_last_not_of(' ') + 1);
-    for (const Process &process : ListProcesses()) {
-        if (process.pid != ::getpid() && process.command.find(text) != std::string::npos)
-            KillProcess(process.pid, BeginningOf(process.pid));
+    // One that is just being executed shows no text yet.
+    constexpr int looks = 5;
+    for (int i = 0; i < looks; ++i, ::usleep(10000)) {
+        for (const Process &process : ListProcesses()) {
+            if (process.pid != ::getpid() && process.command.find(text) != std::string::npos)
+                EndProcess(process.pid, BeginningOf(process.pid));
+        }
     }
 }
 
@@ -90,7 +83,7 @@ void EndClients(const UndoStep &step)
             continue;
         const std::string beginning = BeginningOf(process.pid);
         if (process.pid != ToPid(step.value) || beginning != step.more)
-            KillProcess(process.pid, beginning);
+            EndProcess(process.pid, beginning);
     }
 }
 
@@ -166,6 +159,16 @@ std::string BeginningOf(pid_t pid)
     return field.size() > start_time ? std::string(field[start_time]) : "";
 }
 
+void EndProcess(pid_t pid, std::string_view beginning)
+{
+    if (pid <= 0 || beginning.empty() || BeginningOf(pid) != beginning)
+        return;
+    ::kill(pid, SIGKILL);
+    constexpr int rounds = 100;
+    for (int i = 0; i < rounds && BeginningOf(pid) == beginning && !IsZombie(pid); ++i)
+        ::usleep(10000);
+}
+
 Checkpoint::~Checkpoint()
 {
     if (record_)
@@ -176,7 +179,7 @@ void Checkpoint::Begin(Where where)
 {
     if (noted_in >= 0 || ::geteuid() != 0)
         return;  // a part of a larger change, or of none that could come to pass
-    const std::string text = CommandLine(0, "") + "boot " + BootId() + UndoText(steps_);
+    const std::string text = CommandLine(0, "-", "") + "boot " + BootId() + UndoText(steps_);
     // Its end says that it is whole: what was cut off before that is not a change yet.
     ::unlink(kRecord);
     record_ = OpenFd(kRecord, O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
@@ -210,6 +213,13 @@ bool Checkpoint::PutBack(bool cleared)
     return done;
 }
 
+void Checkpoint::PutBackAll()
+{
+    for (const UndoStep &step : steps_)
+        Do(step, true);
+    End();
+}
+
 void Checkpoint::PutBackFiles()
 {
     for (const UndoStep &step : steps_) {
@@ -218,11 +228,11 @@ void Checkpoint::PutBackFiles()
     }
 }
 
-void Checkpoint::NoteCommand(pid_t pid, std::string_view command)
+void Checkpoint::NoteCommand(pid_t pid, const std::string &beginning, std::string_view command)
 {
     if (noted_in < 0)
         return;
-    const std::string line = CommandLine(pid, command);
+    const std::string line = CommandLine(pid, beginning, command);
     (void)!::pwrite(noted_in, line.data(), line.size(), 0);
 }
 

@@ -49,10 +49,12 @@ class Checkpoint {
     // Puts back all that was added, by the stated tools, and ends. Routes that the kernel still has are only left alone
     // when `cleared` is false. False when an address could not be set.
     bool PutBack(bool cleared = true);
+    // The same where nobody knows what the last command has done.
+    void PutBackAll();
     void PutBackFiles();
 
-    // Notes a command that is about to be started (`pid` is 0) or runs, so that whoever finishes ends it first.
-    static void NoteCommand(pid_t pid, std::string_view command);
+    // Notes a command that is about to be started (`pid` is 0, `beginning` "-") or runs, so that whoever finishes ends it first.
+    static void NoteCommand(pid_t pid, const std::string &beginning, std::string_view command);
 
   private:
     void AddRoutes(const std::vector<Route> &routes, const std::string &interface);
@@ -64,6 +66,9 @@ class Checkpoint {
 // When a process began, in ticks since the system did: with it a number that is used again is told from the old one.
 // Empty for a process that is not there.
 std::string BeginningOf(pid_t pid);
+
+// Kills it and waits for its end, unless it is another process by now.
+void EndProcess(pid_t pid, std::string_view beginning);
 
 // Finishes what a process that died has left: everything is as before its change. After a restart of the system only
 // files are put back. The caller holds the network lock.

@@ -8,46 +8,65 @@
 #include "network/detail/route_change.h"
 
 #include <algorithm>
+#include <cerrno>
 
 #include <net/route.h>
 
 namespace tavo {
 namespace {
 
-void RepairConnected(const std::vector<Route> &routes, const std::string &interface)
+// Each of these is false when a look or a command failed that may well succeed the next time. A command that the kernel
+// refuses is none of these: a gateway may be on no network of ours.
+bool RepairConnected(const std::vector<Route> &routes, const std::string &interface)
 {
     const auto found = AddressOf(interface);
     if (!found)
-        return;
+        return errno == EADDRNOTAVAIL;
     const uint32_t network = found->address.Word() & found->mask.Word();
     const bool present = std::any_of(routes.begin(), routes.end(), [&](const Route &route) {
-        return route.interface == interface && route.destination.Word() == network &&
-               route.mask.Word() == found->mask.Word();
+        return route.interface == interface && route.destination.Word() == network && route.mask == found->mask;
     });
-    if (!present)
-        RunRouteTool("add", Ipv4Route{Ipv4::FromWord(network), found->mask}, interface.c_str());
+    return present || RunRouteTool("add", Ipv4Route{Ipv4::FromWord(network), found->mask}, interface.c_str()) != -1;
 }
 
-void AddDefault(const Ipv4 &gateway)
+bool AddDefault(const Ipv4 &gateway)
 {
-    RunNetCommand("/sbin/route add default gw %s > /dev/null 2>&1", gateway.Text());
+    return RunNetCommand("/sbin/route add default gw %s > /dev/null 2>&1", gateway.Text()) != -1;
 }
 
-void RepairDefault(const std::vector<Route> &routes, const std::string &card, bool dhcp)
+bool RepairDefault(const std::vector<Route> &routes, const std::string &card, bool dhcp)
 {
-    const auto stored = ParseIpv4(ReadSetting(kNetworkFile, "GATEWAY"));
+    const auto setting = TryReadSetting(kNetworkFile, "GATEWAY");
+    if (!setting)
+        return false;
+    const auto stored = ParseIpv4(*setting);
     if (dhcp) {
         const auto leased = ParseIpv4(ReadSetting(DhcpLeaseFile(card), "GATEWAY"));
         const auto gateway = leased ? leased : stored;
-        if (gateway && std::none_of(routes.begin(), routes.end(), [](const Route &route) { return route.IsDefault(); }))
-            AddDefault(*gateway);
-        return;
+        const bool there =
+            std::any_of(routes.begin(), routes.end(), [](const Route &route) { return route.IsDefault(); });
+        return there || !gateway || AddDefault(*gateway);
     }
     const auto leads_there = [&](const Route &route) {
-        return route.IsDefault() && route.gateway.Word() == stored->Word();
+        return route.IsDefault() && route.gateway == *stored;
     };
-    if (stored && std::none_of(routes.begin(), routes.end(), leads_there))
-        AddDefault(*stored);
+    return !stored || std::any_of(routes.begin(), routes.end(), leads_there) || AddDefault(*stored);
+}
+
+bool TryRepair(const std::string &interface, bool dhcp)
+{
+    const auto text = ReadKernelFile("/proc/net/route");
+    if (!text)
+        return false;
+    const auto routes = ParseRouteTable(*text).value_or(std::vector<Route>());
+    const std::vector<std::string> cards = WiredInterfaces();
+    bool done = true;
+    for (const std::string &card : cards)
+        done = RepairConnected(routes, card) && done;
+    const std::string &first = cards.empty() ? interface : cards.front();
+    const auto mode = first == interface ? std::optional<std::string>(dhcp ? "dhcp" : "static")
+                                         : TryReadSetting(InterfaceFile(first), "BOOTPROTO");
+    return mode && RepairDefault(routes, first, *mode == "dhcp") && done;
 }
 
 }  // namespace
@@ -60,12 +79,9 @@ std::vector<Route> LiveRoutes()
 
 void RepairRoutes(const std::string &interface, bool dhcp)
 {
-    const std::vector<Route> routes = LiveRoutes();
-    const std::vector<std::string> cards = WiredInterfaces();
-    for (const std::string &card : cards)
-        RepairConnected(routes, card);
-    const std::string &first = cards.empty() ? interface : cards.front();
-    RepairDefault(routes, first, first == interface ? dhcp : ReadSetting(InterfaceFile(first), "BOOTPROTO") == "dhcp");
+    // Without its default route the appliance is cut off from whoever manages it, so a passing failure must not cost it.
+    if (!TryRepair(interface, dhcp))
+        TryRepair(interface, dhcp);
 }
 
 void RepairRoutes()

@@ -9,7 +9,10 @@
 #include "core/detail/line_reader.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <vector>
+
+#include <sys/stat.h>
 
 namespace tavo {
 namespace {
@@ -62,12 +65,21 @@ int RewriteSettings(const std::string &path, std::span<const SettingChange> chan
     return rewrite.Replace(EditSettings(text, changes), 0644);
 }
 
-std::string ReadSetting(const std::string &path, const char *key)
+std::optional<std::string> TryReadSetting(const std::string &path, const char *key)
 {
     const KeepFault keep;
     char value[256];
     const int length = TLIBFileGetKeyValue(path.c_str(), key, value, sizeof value, 0);
-    return length > 0 ? std::string(value, static_cast<size_t>(length - 1)) : "";
+    if (length > 0)
+        return std::string(value, static_cast<size_t>(length - 1));
+    struct stat st;
+    const bool absent = TLIBErrGet() == ERR_KEY_NOT_FOUND || (::stat(path.c_str(), &st) != 0 && errno == ENOENT);
+    return absent ? std::optional<std::string>("") : std::nullopt;
+}
+
+std::string ReadSetting(const std::string &path, const char *key)
+{
+    return TryReadSetting(path, key).value_or("");
 }
 
 }  // namespace tavo

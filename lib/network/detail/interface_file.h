@@ -27,6 +27,9 @@ std::string EditSettings(std::string_view text, std::span<const SettingChange> c
 // The same in a file, by one safe rewrite; a file that does not exist is created. 0 or the code of what failed.
 int RewriteSettings(const std::string &path, std::span<const SettingChange> changes);
 
+// The value of a key, "" when it is absent; empty when the file is there and cannot be read.
+std::optional<std::string> TryReadSetting(const std::string &path, const char *key);
+
 // The value of a key; empty when it is absent, or does not fit 255 bytes. Leaves the error state alone.
 std::string ReadSetting(const std::string &path, const char *key);
 

@@ -10,12 +10,16 @@ namespace tavo {
 int RunNetText(const std::string &command)
 {
     const KeepChildStatus keep;
-    Checkpoint::NoteCommand(0, command);
+    Checkpoint::NoteCommand(0, "-", command);
     const pid_t pid = StartCommand(command, kInherited, kInherited);
     if (pid < 0)
         return -1;
-    Checkpoint::NoteCommand(pid, command);
-    return CollectChild(pid);
+    const std::string beginning = BeginningOf(pid);
+    Checkpoint::NoteCommand(pid, beginning, command);
+    const int status = CollectChild(pid);
+    if (status == -1)
+        EndProcess(pid, beginning);  // what could not be waited for must not go on beside what comes next
+    return status;
 }
 
 }  // namespace tavo

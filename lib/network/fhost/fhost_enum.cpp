@@ -64,16 +64,16 @@ extern "C" int TAVOFHOSTEnum(TAVOFHOSTCALLBACK pfnHost, void *pContext, int cSec
                 return Fail(ERR_OP_FAILURE);
         }
         Hosts hosts(pfnHost, pContext);
-        if (ErrFHOSTSendQueryPkt() != 0) {
+        const bool sent = ErrFHOSTSendQueryPkt() == 0;
+        if (!sent)
             LogError("%s(%d): ErrFHOSTSendQueryPkt() failed!");
-            return Fail(ERR_OP_FAILURE);
-        }
         for (int second = 0; second < cSeconds; ++second) {
             ::sleep(1);
             // Another caller may take the list at any moment, and with it who has just been added.
             if (hosts.Read(tavo::kHostList) != 0 || hosts.Read(tavo::kHostListTaken) != 0)
                 break;
         }
-        return hosts.Count();
+        // Where one interface cannot send, the others may well have found somebody.
+        return sent || hosts.Count() > 0 ? hosts.Count() : Fail(ERR_OP_FAILURE);
     });
 }

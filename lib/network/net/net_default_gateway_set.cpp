@@ -19,16 +19,24 @@ int SetGateway(const std::string &gateway)
     before.AddSetting(tavo::kNetworkFile, "GATEWAY");
     before.AddGateway();
     before.Begin();
-    tavo::RunNetCommand("/sbin/route delete default > /dev/null 2>&1");
+    // There may be none to delete. But one that is still there would stay beside the new one.
+    if (tavo::RunNetCommand("/sbin/route delete default > /dev/null 2>&1") == -1) {
+        before.PutBackAll();
+        return Fail(ERR_OP_FAILURE);
+    }
     if (TLIBFileSetKeyValue(tavo::kNetworkFile, "GATEWAY", gateway.c_str(), nullptr) < 0) {
         const int code = TLIBErrGet();
         LogError("%s(%d): TLIBFileSetKeyValue(%s, GATEWAY, %s) failed.(%X)", tavo::kNetworkFile, gateway, code);
         before.PutBack();
         return Fail(code);
     }
-    if (tavo::RunNetCommand("/sbin/route add default gw %s > /dev/null 2>&1", gateway) != 0) {
+    if (const int status = tavo::RunNetCommand("/sbin/route add default gw %s > /dev/null 2>&1", gateway)) {
         LogError("%s(%d): failed to set default gateway.");
-        before.PutBack();  // without a route the appliance would be cut off from whoever sets it
+        // Without a route the appliance would be cut off from whoever sets it.
+        if (status == -1)
+            before.PutBackAll();
+        else
+            before.PutBack();
         return Fail(ERR_OP_FAILURE);
     }
     before.End();

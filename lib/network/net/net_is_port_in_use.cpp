@@ -7,12 +7,14 @@
 #include "network/detail/kernel_interface.h"
 #include "network/detail/socket_table.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 
 namespace {
 
 constexpr const char *kTables[] = {"/proc/net/tcp", "/proc/net/udp"};
+constexpr const char *kIpv6Tables[] = {"/proc/net/tcp6", "/proc/net/udp6"};  // a listener there often takes IPv4, too
 
 bool Holds(std::string_view table, int port)
 {
@@ -39,6 +41,8 @@ extern "C" int BlTLIBIsPortInUse(int port)
             if (Holds(*table, port))
                 return true;
         }
-        return false;
+        return std::any_of(std::begin(kIpv6Tables), std::end(kIpv6Tables), [&](const char *path) {
+            return Holds(tavo::ReadKernelFile(path).value_or(""), port);  // none: the kernel has no IPv6
+        });
     });
 }

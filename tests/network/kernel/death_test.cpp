@@ -20,6 +20,7 @@
 #include <optional>
 
 #include <sys/utsname.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 using test::Card;
@@ -129,6 +130,43 @@ class Death : public testing::Test {
         }));
     }
 
+    // One system call of the library's fails at each place. What is said of the result is true of the network.
+    void FailEverywhere(const std::function<int()> &change, const std::function<void()> &back)
+    {
+        EXPECT_TRUE(here_->Run([&] {
+            const std::string before = State();
+            const std::function<void()> work = [&] {
+                const int result = change();
+                ::_exit(result == 0 ? 0 : result == -2 ? 2 : 1);
+            };
+            const auto calls = test::DistinctCalls(test::SystemCallsOf(work));
+            EXPECT_GT(calls.size(), 20u);
+            const std::string asked = State();
+            size_t failed = 0;
+            for (size_t i = 0; i < calls.size(); i += static_cast<size_t>(test::Stride())) {
+                for (const int error : {EIO, ENOSPC}) {
+                    back();
+                    EXPECT_EQ(State(), before);
+                    const test::Ending ending = test::FailsAtCall(calls[i].index, error, work);
+                    EXPECT_FALSE(ending.hung) << calls[i].Name();
+                    const int status = WIFEXITED(ending.status) ? WEXITSTATUS(ending.status) : 128;
+                    EXPECT_LE(status, 2) << calls[i].Name() << " " << ending;
+                    EXPECT_TRUE(HasDefaultRoute()) << calls[i].Name() << " " << calls[i].index;
+                    EXPECT_EQ(TAVONetHostsRefresh(), 0);
+                    const std::string found = State();
+                    EXPECT_TRUE(status == 2 || found == before || found == asked)
+                        << calls[i].Name() << " " << calls[i].index << " status " << status << "\n"
+                        << found << "\nbefore:\n"
+                        << before << "\nasked:\n"
+                        << asked;
+                    failed += status == 1;
+                }
+            }
+            EXPECT_GT(failed, 0u);
+            return true;
+        }));
+    }
+
     std::optional<VirtualCable> cable_;
     std::optional<Node> here_;
 };
@@ -140,6 +178,8 @@ TEST_F(Death, LeavesAnAddress)
         return TAVONetSetCard1(&card, &card);
     };
     DieEverywhere([=] { return set("192.0.2.60"); }, [=] { EXPECT_EQ(set("192.0.2.20"), 0); });
+    EXPECT_TRUE(here_->Run([=] { return set("192.0.2.20") == 0; }));
+    FailEverywhere([=] { return set("192.0.2.60"); }, [=] { EXPECT_EQ(set("192.0.2.20"), 0); });
 }
 
 // A client that sets what it gets and goes to the background; /sbin/dhcpcd of the scenario.
@@ -179,8 +219,18 @@ TEST_F(Death, LeavesAnAddressAlsoOnTheWayToDhcp)
 
 TEST_F(Death, LeavesAGateway)
 {
-    DieEverywhere([] { return TAVONetDefaultGatewaySet("192.0.2.30"); },
-                  [] { EXPECT_EQ(TAVONetDefaultGatewaySet("192.0.2.99"), 0); });
+    const auto set = [] {
+        return TAVONetDefaultGatewaySet("192.0.2.30");
+    };
+    const auto back = [] {
+        EXPECT_EQ(TAVONetDefaultGatewaySet("192.0.2.99"), 0);
+    };
+    DieEverywhere(set, back);
+    EXPECT_TRUE(here_->Run([=] {
+        back();
+        return true;
+    }));
+    FailEverywhere(set, back);
 }
 
 TEST_F(Death, LeavesAName)
@@ -212,6 +262,56 @@ TEST_F(Death, LeavesAnIPv6Address)
             EXPECT_EQ(remove(), 0);
         }
     });
+}
+
+// To DHCP and back, whatever the server does: the box can always be reached from beyond its router.
+TEST_F(Death, IsNotWhatALeaseCosts)
+{
+    Node router("router");
+    cable_->Plug(router, "eth0");
+    ASSERT_EQ(router.Shell("ifconfig eth0 192.0.2.99 netmask 255.255.255.0 up && ip addr add 192.0.2.98/24 dev eth0 && "
+                           "ip addr add 198.51.100.1/32 dev lo"),
+              0);
+    const auto scripted = [](const char *tool) {
+        return std::string("#!/bin/sh\nexec /bin/busybox ") + tool + " \"$@\"\n";
+    };
+    test::Scenario scenario;
+    scenario.InAnyOrder();
+    scenario.ExpectAny("/sbin/ifconfig").AnyTimes().Runs(scripted("ifconfig"));
+    scenario.ExpectAny("/sbin/route").AnyTimes().Runs(scripted("route"));
+    // As /tmp/server says: a lease, with this router or that, none at all, or one of which the client dies.
+    scenario.ExpectAny("/sbin/dhcpcd").AnyTimes().Runs(R"(#!/bin/sh
+read server router </tmp/server
+[ "$server" != absent ] || exit 1
+busybox ifconfig "$2" 192.0.2.40 netmask 255.255.255.0
+[ "$server" != dying ] || kill -9 $$
+busybox route add default gw $router
+printf 'IPADDR=192.0.2.40\nNETMASK=255.255.255.0\nGATEWAY=%s\n' $router >/etc/dhcpc/dhcpcd-"$2".info
+)");
+    const char *const servers[] = {"there 192.0.2.98", "absent", "dying", "there 192.0.2.99"};
+    const int rounds = test::Rounds(100);
+    for (int round = 0; round < rounds; ++round) {
+        const std::string server = servers[round % 4];
+        EXPECT_TRUE(here_->Run([&] {
+            std::filesystem::create_directories("/etc/dhcpc");
+            WriteFile("/tmp/server", server + "\n");
+            const TAVONETCARD lease = Card(TAVO_NET_DHCP);
+            const TAVONETCARD fixed = Card(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0");
+            const bool works = server.starts_with("there");
+            for (const TAVONETCARD *card : {&lease, &fixed}) {
+                EXPECT_EQ(TAVONetSetCard1(card, nullptr), card == &fixed || works ? 0 : -1) << server;
+                const std::string gateway = card == &lease && works ? server.substr(6) : "192.0.2.99";
+                char live[20] = "";
+                EXPECT_EQ(TAVONetDefaultGatewayGet(live, sizeof live), 0);
+                EXPECT_EQ(live, gateway) << server;
+                EXPECT_EQ(test::ShellStatus("busybox ping -c 1 -w 5 198.51.100.1 >/dev/null"), 0) << server;
+                EXPECT_THAT(Text("/etc/hosts"),
+                            testing::HasSubstr(card == &lease && works ? "192.0.2.40\there\n" : "192.0.2.20\there\n"));
+            }
+            return true;
+        })) << "round "
+            << round << ", " << server;
+    }
 }
 
 // After a restart of the system the kernel has nothing that could be put back, and the files count.

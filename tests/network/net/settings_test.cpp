@@ -546,6 +546,9 @@ TEST_F(NetSettings, APortIsInUseWhenASocketHasIt)
     test::ForgetFault();
     EXPECT_EQ(BlTLIBIsPortInUse(10), 0) << "a state is no port";
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    tree_.Put("/proc/net/tcp6",
+              header + "   0: " + std::string(32, '0') + ":1F91 " + std::string(32, '0') + ":0000 0A\n");
+    EXPECT_EQ(BlTLIBIsPortInUse(8081), 1);
     EXPECT_EQ(BlTLIBIsPortInUse(0), 0);
     EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
     tree_.Remove("/proc/net/udp");

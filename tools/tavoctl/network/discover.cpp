@@ -1,6 +1,5 @@
 // tavoctl discover: the appliances on the network.
 #include "families.h"
-#include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/program.h"
 #include "frame/progress.h"
@@ -8,57 +7,25 @@
 #include "frame/watch.h"
 
 #include "tavo_fhost.h"
-#include "tavo_proc.h"
 
-#include <cstdio>
-#include <iostream>
 #include <utility>
-
-#include <unistd.h>
 
 namespace tavoctl {
 namespace {
 
 using Hosts = std::vector<std::pair<std::string, std::string>>;  // name and address
 
-constexpr unsigned answer_seconds = 10;
-
-std::string Interfaces(std::uint32_t mask)
-{
-    std::string text;
-    for (int i = 0; i < 8; ++i) {
-        if (mask & (1u << i))
-            text += (text.empty() ? "" : ", ") + std::to_string(i + 1);
-    }
-    return text;
-}
-
-// Where some interface cannot send, the library gives up; the others may well have found somebody.
-void CollectFromTheRest()
-{
-    const Failure failure = LibraryFailure("ask the network", "is findhostd running? Is the network up?");
-    if (TLIBReadPidFile("/var/run/findhostd.pid") <= 0)
-        throw failure;
-    const std::uint32_t mask = ErrFHOSTSendQueryPkt();
-    if (mask == 0)
-        throw failure;
-    std::cerr << "tavoctl: not asked from wired interface " << Interfaces(mask) << ", which has no address\n";
-    ::sleep(answer_seconds);
-    // As the library does when all is well.
-    if (std::rename("/tmp/tavods.list", "/tmp/tavods.list.tmp") != 0)
-        throw failure;
-}
+constexpr int answer_seconds = 10;
 
 Hosts Find()
 {
-    if (TAVOFHOSTDumpHost() != 0)
-        CollectFromTheRest();
-    StringHash hash;
-    if (TAVOFHOSTGet2Hash(hash.Address()) < 0)
-        throw LibraryFailure("read who has answered");
     Hosts hosts;
-    for (auto &[key, address] : hash.Pairs())
-        hosts.emplace_back(key.substr(0, key.size() - address.size() - 2), std::move(address));  // "NAME(ADDRESS)"
+    const auto note = [](const TAVOFHOST *host, void *context) {
+        static_cast<Hosts *>(context)->emplace_back(host->szName, host->szIp);
+        return 0;
+    };
+    if (TAVOFHOSTEnum(note, &hosts, answer_seconds) < 0)
+        throw LibraryFailure("ask the network", "is findhostd running? Is the network up?");
     return hosts;
 }
 

@@ -164,13 +164,31 @@ class NetMtu : public Verb {
             throw UsageFailure("set the MTU " + bytes_, "that is no number");
         if (TAVONetSetMTUValue(interface_.c_str(), mtu) != 0)
             throw LibraryFailure("set the MTU of " + interface_ + " to " + bytes_,
-                                 TLIBErrGet() == ERR_OP_FAILURE ? "it is stored, but the card does not take it" : "");
+                                 TLIBErrGet() == ERR_OP_FAILURE ? "the card does not take it" : "");
         return exit_done;
     }
 
   private:
     std::string interface_;
     std::string bytes_;
+};
+
+class NetRefresh : public Verb {
+  public:
+    static constexpr VerbInfo info = {
+        "refresh", changes,
+        "Puts back what a program that died in the middle of a change has left, and brings "
+        "the appliance's name in /etc/hosts up to date. Never waits: it leaves both to a "
+        "program that is changing the network just now. The start of the network and the "
+        "DHCP client's hook run it.",
+        "tavoctl net refresh"};
+
+    int Run(const Call &) override
+    {
+        if (TAVONetHostsRefresh() < 0)
+            throw LibraryFailure("refresh the network");
+        return exit_done;
+    }
 };
 
 class NetCheckAddress : public Verb {
@@ -222,6 +240,7 @@ void AddNet(Program &program)
     net.Add<NetHostname>();
     net.Add<NetMtu>();
     net.Add<NetCheckAddress>();
+    net.Add<NetRefresh>();
     AddNetCards(net);
 }
 
