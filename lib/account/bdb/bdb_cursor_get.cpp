@@ -29,9 +29,9 @@ extern "C" int TAVOBDbCursorGet(TAVOBDB *pDb, int fSkipReserved, void **ppKey, i
     tavo::HeapBlock<void> value_copy = tavo::CopyBytes(value);
     if (!key_copy || !value_copy)
         return Fail(ERR_OUT_OF_MEMORY);
-    *ppKey = key_copy.release();
+    *ppKey = key_copy.Release();
     *pcbKey = static_cast<int>(key.size());
-    *ppValue = value_copy.release();
+    *ppValue = value_copy.Release();
     *pcbValue = static_cast<int>(value.size());
     return 0;
 }

@@ -21,7 +21,7 @@ extern "C" int TAVOBDbGet(TAVOBDB *pDb, const void *pKey, int cbKey, void **ppVa
     tavo::HeapBlock<void> copy = tavo::CopyBytes(value);
     if (!copy)
         return Fail(ERR_OUT_OF_MEMORY);
-    *ppValue = copy.release();
+    *ppValue = copy.Release();
     *pcbValue = static_cast<int>(value.size());
     return 0;
 }

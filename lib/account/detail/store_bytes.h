@@ -19,8 +19,8 @@ inline HeapBlock<void> CopyBytes(std::string_view bytes)
 {
     HeapBlock<void> copy(std::malloc(bytes.size() + 1));
     if (copy) {
-        std::memcpy(copy.get(), bytes.data(), bytes.size());
-        static_cast<char *>(copy.get())[bytes.size()] = 0;
+        std::memcpy(copy.Get(), bytes.data(), bytes.size());
+        static_cast<char *>(copy.Get())[bytes.size()] = 0;
     }
     return copy;
 }

@@ -29,7 +29,7 @@ extern "C" int TAVOGroupAlloc2(TAVOGROUP **ppGroup, const char *szName, int gid,
     if (!group)
         return Fail(ERR_OUT_OF_MEMORY);
 
-    char **members = reinterpret_cast<char **>(group.get() + 1);
+    char **members = reinterpret_cast<char **>(group.Get() + 1);
     char *next = reinterpret_cast<char *>(members + count + 1);
     *group = {.szName = next,
               .nGid = gid,
@@ -44,6 +44,6 @@ extern "C" int TAVOGroupAlloc2(TAVOGROUP **ppGroup, const char *szName, int gid,
         next = ::stpcpy(next, *member) + 1;
     }
     *members = nullptr;
-    TAVOGroupFree(std::exchange(*ppGroup, group.release()));
+    TAVOGroupFree(std::exchange(*ppGroup, group.Release()));
     return 0;
 }

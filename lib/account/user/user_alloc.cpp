@@ -35,7 +35,7 @@ extern "C" int TAVOUserAlloc(TAVOUSER **ppUser, const char *szName, const char *
     if (!user)
         return Fail(ERR_OUT_OF_MEMORY);
 
-    char *next = reinterpret_cast<char *>(user.get() + 1);
+    char *next = reinterpret_cast<char *>(user.Get() + 1);
     char *copies[std::size(texts)];
     for (size_t i = 0; i < std::size(texts); ++i) {
         copies[i] = next;
@@ -54,6 +54,6 @@ extern "C" int TAVOUserAlloc(TAVOUSER **ppUser, const char *szName, const char *
              .nKind = KindOf(szName),
              .nPrivilege = privilege,
              .cbBlock = static_cast<int32_t>(size)};
-    TAVOUserFree(std::exchange(*ppUser, user.release()));
+    TAVOUserFree(std::exchange(*ppUser, user.Release()));
     return 0;
 }

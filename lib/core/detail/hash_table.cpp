@@ -2,6 +2,7 @@
 #include "core/detail/hash_table.h"
 
 #include "core/detail/hash_slot.h"
+#include "core/detail/owner.h"
 #include "core/detail/text_overlap.h"
 
 #include <climits>
@@ -122,11 +123,11 @@ bool StorePair(TLIBSZHASH *hash, int slot, std::string_view key, std::string_vie
     HeapBlock<char> kept;
     // A text that the hash has given up may stand just where the key goes.
     if (Overlap(hash->pszNextStr, key.size() + 1, value.data(), value.size() + 1)) {
-        kept.reset(static_cast<char *>(std::malloc(value.size() + 1)));
+        kept.Reset(static_cast<char *>(std::malloc(value.size() + 1)));
         if (!kept)
             return false;
-        std::memcpy(kept.get(), value.data(), value.size() + 1);
-        value = {kept.get(), value.size()};
+        std::memcpy(kept.Get(), value.data(), value.size() + 1);
+        value = {kept.Get(), value.size()};
     }
     StoreNewPair(hash, slot, key, value);
     return true;

@@ -2,8 +2,9 @@
 #ifndef TAVO_CORE_DETAIL_LINE_READER_H
 #define TAVO_CORE_DETAIL_LINE_READER_H
 
+#include "core/detail/owner.h"
+
 #include <cstddef>
-#include <memory>
 #include <string_view>
 
 namespace tavo {
@@ -50,7 +51,7 @@ class LineReader {
 
     int fd_;
     bool failed_ = false;
-    std::unique_ptr<char[]> buffer_;
+    HeapBlock<char> buffer_;
     size_t capacity_ = 0;
     std::string_view unread_;
 };

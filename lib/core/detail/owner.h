@@ -6,7 +6,7 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstdlib>
-#include <memory>
+#include <type_traits>
 #include <utility>
 
 #include <unistd.h>
@@ -92,16 +92,36 @@ class File {
 };
 
 // A block from malloc: what is handed to a caller, who releases it with free.
-struct HeapFree {
-    void operator()(void *block) const noexcept
+template <class T>
+class HeapBlock {
+  public:
+    HeapBlock() noexcept = default;
+    explicit HeapBlock(T *block) noexcept : block_(block) {}
+    HeapBlock(HeapBlock &&other) noexcept : block_(other.Release()) {}
+    HeapBlock &operator=(HeapBlock &&other) noexcept
+    {
+        if (this != &other)
+            Reset(other.Release());
+        return *this;
+    }
+    ~HeapBlock() { Reset(); }
+
+    explicit operator bool() const noexcept { return block_ != nullptr; }
+    T *Get() const noexcept { return block_; }
+    std::add_lvalue_reference_t<T> operator*() const noexcept { return *block_; }
+    T *operator->() const noexcept { return block_; }
+    T *Release() noexcept { return std::exchange(block_, nullptr); }
+
+    void Reset(T *block = nullptr) noexcept
     {
         KeepErrno keep;
-        std::free(block);
+        std::free(block_);
+        block_ = block;
     }
-};
 
-template <class T>
-using HeapBlock = std::unique_ptr<T, HeapFree>;
+  private:
+    T *block_ = nullptr;
+};
 
 }  // namespace tavo
 

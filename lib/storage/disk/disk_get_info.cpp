@@ -2,6 +2,7 @@
 #include "tavo_disk.h"
 
 #include "core/detail/guard.h"
+#include "core/detail/owner.h"
 #include "storage/detail/device_name.h"
 #include "storage/detail/disk_size.h"
 #include "storage/detail/proc_partitions.h"
@@ -47,7 +48,7 @@ extern "C" int TAVODiskGetInfo(int nKind, int nDevice, TAVODISKINFO **ppInfo)
         name.copy(info->szName, sizeof info->szName - 1);
         info->nKind = kDiskKind;
         info->cMibDisk = bytes >> 20;
-        *ppInfo = info.release();
+        *ppInfo = info.Release();
         return 0;
     });
 }

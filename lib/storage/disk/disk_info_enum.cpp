@@ -5,6 +5,7 @@
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "core/detail/model_setting.h"
+#include "core/detail/owner.h"
 #include "storage/detail/disk_path.h"
 #include "storage/detail/open_disk.h"
 

@@ -3,6 +3,7 @@
 
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
+#include "core/detail/owner.h"
 #include "storage/detail/disk_path.h"
 #include "storage/detail/disk_size.h"
 
@@ -43,7 +44,7 @@ extern "C" int DiskInfoGet(const char *szPath, DISKINFO **ppInfo)
         TAVOLnxDiskGetModel(info->szPath, info->szModel, sizeof info->szModel);
         info->cbDisk = bytes - bytes % tavo::kSectorSize;
         info->nTemperature = TAVODiskTemperatureGet(info->szPath);
-        *ppInfo = info.release();
+        *ppInfo = info.Release();
         return 1;
     });
 }

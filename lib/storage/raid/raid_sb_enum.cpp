@@ -18,7 +18,7 @@ extern "C" int RAIDSBEnum(const TLIBSZLIST *pslMembers, RAIDSBENTRY **ppEntry)
         return Fail(ERR_OUT_OF_MEMORY);
     int count = 0;
     for (int i = 0; i < pslMembers->nItem; ++i) {
-        RAIDSBENTRY &entry = entries.get()[count];
+        RAIDSBENTRY &entry = entries.Get()[count];
         const int result = RAIDSBGet(pslMembers->pszItem[i], &entry.superblock);
         if (result < 0)
             return -1;
@@ -28,6 +28,6 @@ extern "C" int RAIDSBEnum(const TLIBSZLIST *pslMembers, RAIDSBENTRY **ppEntry)
         ++count;
     }
     if (count > 0)
-        *ppEntry = entries.release();
+        *ppEntry = entries.Release();
     return count;
 }
