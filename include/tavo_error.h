@@ -197,16 +197,16 @@ TAVO_API int TAVOErrorGetLine(void);
  * table) prints nothing. It looks at errno, not at tavoerrno. */
 TAVO_API void TLIBErrPrint(void);
 
-/* Empties the log file szPath, creating it when it is missing, and syncs it to disk. A NULL path, or a file that
- * cannot be opened, is silently left alone; in a directory that everybody may write to, a symbolic link is not
- * followed. Sets no code. */
+/* Empties the log file szPath, creating it (mode 0644) when it is missing, and syncs it to disk. A NULL path, or a file
+ * that cannot be opened, is silently left alone. In a directory that everybody may write to, so is everything but a
+ * regular file that belongs to root or to the caller and has no second name. Sets no code. */
 TAVO_API void TLIBErrLogInitial(const char *szPath);
 
-/* Appends szMessage and a newline to the log file szPath (created when missing) and syncs it to disk. "%%" in the
- * message is written as one "%"; every other "%" stands for itself.
+/* Appends szMessage and a newline to the log file szPath (created with mode 0644 when missing) and syncs it to disk.
+ * "%%" in the message is written as one "%"; every other "%" stands for itself.
  * Returns 0, or -1 with
  *   ERR_BAD_PARAMETERS  szPath or szMessage is NULL
- *   ERR_OPEN_FAILED     the file cannot be opened, or it is a symbolic link in a directory that everybody may write to
+ *   ERR_OPEN_FAILED     the file cannot be opened, or TLIBErrLogInitial would leave it alone
  *   ERR_WRITE_FAILED    the text could not be written and synced; a part of it may stand in the file */
 TAVO_API int TLIBErrLogSet(const char *szPath, const char *szMessage);
 

@@ -16,7 +16,8 @@
  * after a dot), is synced to disk, gets the owner, group, permission bits and extended attributes of the old file, and
  * is renamed over it. A crash leaves the old file or the new one. A symbolic link is followed and stays a link, except in
  * a directory that everybody may write to (/tmp), where writers refuse it with ERR_OPEN_FAILED; a hard link is cut. After
- * a failure the old file is as it was and the temporary file is gone. The codes of a rewrite are
+ * a failure the old file is as it was and the temporary file is gone. A new file has mode 0644, whatever the umask. The
+ * codes of a rewrite are
  *   ERR_OPEN_FAILED     the file cannot be opened or is no regular file, or the temporary file cannot be created
  *   ERR_STAT_FAILED     the state of the open file cannot be read
  *   ERR_WRITE_FAILED    reading the old text or writing the new one failed (a full disk)
@@ -49,9 +50,8 @@ TAVO_BEGIN_DECLS
 TAVO_API int TLIBFileGetKeyValue(const char *szPath, const char *szKey, char *szBuf, int cbBuf, int flags);
 
 /* Sets szKey to szValue by a safe rewrite: the first line of the key is replaced, later ones are dropped, and a key
- * that is not there is appended. A file that does not exist is created with that one line and the mode that the umask
- * leaves. Returns 1, or -1 with ERR_BAD_PARAMETERS (a NULL argument other than szFormat, or see above) or a code of a
- * rewrite.
+ * that is not there is appended. A file that does not exist is created with that one line.
+ * Returns 1, or -1 with ERR_BAD_PARAMETERS (a NULL argument other than szFormat, or see above) or a code of a rewrite.
  * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileSetKeyValue(const char *szPath, const char *szKey, const char *szValue, const char *szFormat);
 
@@ -60,7 +60,8 @@ TAVO_API int TLIBFileSetKeyValue(const char *szPath, const char *szKey, const ch
  *   ERR_KEY_EXISTS      a line sets the key; nothing is written
  * or -1 with the old text in place and
  *   ERR_BAD_PARAMETERS  a NULL argument other than szFormat, a directory, or see above
- *   ERR_OPEN_FAILED     the file cannot be opened for writing, or created
+ *   ERR_OPEN_FAILED     the file cannot be opened for writing, or created; or it is, in a directory that everybody may
+ *                       write to, a link, a file of somebody else's, or one with a second name
  *   ERR_WRITE_FAILED    the line could not be written and synced
  *   ERR_READ_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileAppendKey(const char *szPath, const char *szKey, const char *szValue, const char *szFormat);
@@ -143,8 +144,8 @@ TAVO_API int TLIBFileComment(const char *szPath, const char *szKey);
  * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileReplaceSubStr(const char *szPath, const char *szOld, const char *szNew);
 
-/* Creates a file of mode 0600 whose name is szTemplate with its last six characters, which must be "XXXXXX", made
- * unique; the name is written to szTemplate.
+/* Creates a file (mode 0600, whatever the umask) whose name is szTemplate with its last six characters, which must be
+ * "XXXXXX", made unique; the name is written to szTemplate.
  * Returns a stream for writing that the caller closes (close-on-exec), or NULL with
  *   ERR_BAD_PARAMETERS  szTemplate is NULL
  *   ERR_OPEN_FAILED     the file or the stream cannot be created; no file is left */
@@ -155,8 +156,10 @@ TAVO_API FILE *TLIBFileTempFileOpen(char *szTemplate);
  * untouched and ERR_BAD_PARAMETERS (a NULL argument, a negative size, a name that does not fit). */
 TAVO_API int TLIBFileITmpName(const char *szPrefix, char *szBuf, int cbBuf);
 
-/* Creates an empty file unless the file exists; an existing file is left alone, its times too.
- * Returns 0, or -1 with ERR_BAD_PARAMETERS (NULL) or ERR_OPEN_FAILED (cannot be created, or is no regular file). */
+/* Creates an empty file (mode 0644, whatever the umask) unless the file exists; an existing file is left alone, its
+ * times too.
+ * Returns 0, or -1 with ERR_BAD_PARAMETERS (NULL) or ERR_OPEN_FAILED (cannot be created, is not a regular file, or is one
+ * that TLIBFileAppendKey refuses). */
 TAVO_API int TLIBFileTouch(const char *szPath);
 
 /* Removes a leading UTF-8 byte-order mark by a safe rewrite.

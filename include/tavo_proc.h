@@ -66,8 +66,10 @@ TAVO_API int TLIBTimedExec(int cSeconds, const char *szProgram, ...);
  *   ERR_OPEN_FAILED     the file cannot be opened, is no regular file, or is a symbolic link and the caller root */
 TAVO_API pid_t TLIBReadPidFile(const char *szPath);
 
-/* Writes the caller's process id and a newline to szPath, creating the file with mode 0666 less the umask.
- * In a directory that everybody may write to, an existing file must be the caller's own and no link.
+/* Writes the caller's process id and a newline to szPath, creating the file (mode 0644, whatever the umask). Of an
+ * existing file, the permission of group and others to write is taken away.
+ * In a directory that everybody may write to, an existing file must belong to root or to the caller, be regular and have
+ * no second name.
  * Returns 0, or -1 with
  *   ERR_BAD_PARAMETERS  szPath is NULL
  *   ERR_OPEN_FAILED     the file cannot be created or opened, is no regular file or is not to be trusted

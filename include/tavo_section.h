@@ -48,7 +48,8 @@ TAVO_API int TLIBFileEnumSection(const char *szPath, TLIBSZLIST **ppslNames);
 /* Appends a section in place, whether or not one of that name is there. A file that does not exist is created.
  * Returns 0, or -1 with the old text in place and
  *   ERR_BAD_PARAMETERS  szPath, szSection or pshPairs is NULL, or what cannot be written
- *   ERR_OPEN_FAILED     the file cannot be opened for writing, or created, or is no regular file
+ *   ERR_OPEN_FAILED     the file cannot be opened for writing, or created, or is not a regular file; or it is one that
+ *                       TLIBFileAppendKey refuses
  *   ERR_WRITE_FAILED    the text could not be written and synced
  *   ERR_OUT_OF_MEMORY */
 TAVO_API int ErrTLIBFileAddSection(const char *szPath, const char *szSection, const TLIBSZHASH *pshPairs,

@@ -2,6 +2,7 @@
 #include "core/detail/file_append.h"
 
 #include "core/detail/open_file.h"
+#include "core/detail/trusted_file.h"
 
 namespace tavo {
 namespace {
@@ -18,9 +19,9 @@ void CutBack(int fd, off_t old_size, size_t appended)
 
 }  // namespace
 
-Fd OpenToAppend(const char *path)
+Fd OpenToAppend(const char *path) noexcept
 {
-    return OpenRegular(path, O_RDWR | O_APPEND | (IsInPublicDirectory(path) ? O_NOFOLLOW : 0));
+    return OpenTrustedRegular(path, O_RDWR | O_APPEND);
 }
 
 bool AppendText(int fd, std::string text)

@@ -15,13 +15,6 @@ namespace {
 
 constexpr mode_t kPermissions = 07777;
 
-mode_t Umask()
-{
-    const mode_t mask = ::umask(077);  // it can only be read by setting it; for that moment the strictest
-    ::umask(mask);
-    return mask;
-}
-
 // Access lists, security labels and whatever else hangs on the old file. What cannot be copied is left out: not every
 // file system takes them, and the setting is worth more than its label.
 void CopyAttributes(int from, int to) noexcept
@@ -86,7 +79,7 @@ bool FileRewrite::Complete(Fd &temp, std::string_view text, mode_t mode_of_new) 
     if (!WriteAll(fd, text))
         return false;
     if (missing_) {
-        if (::fchmod(fd, mode_of_new & ~Umask()) != 0)
+        if (::fchmod(fd, mode_of_new & ~kWritableByOthers) != 0)
             return false;
     } else {
         struct stat made;

@@ -24,11 +24,11 @@ class FileRewrite {
     bool Read(std::string &text);
 
     // ERR_OPEN_FAILED: no temporary file; ERR_WRITE_FAILED: it could not be completed (errno says why);
-    // ERR_RENAME_FAILED. An existing file's owner and mode are kept, a new one gets `mode_of_new` less the umask.
-    int Replace(std::string_view text, mode_t mode_of_new = 0666);
+    // ERR_RENAME_FAILED. An existing file's owner and mode are kept, a new one gets `mode_of_new`, whatever the umask.
+    int Replace(std::string_view text, mode_t mode_of_new = 0644);
 
     // The same through a temporary file elsewhere; when it lies on another file system, ERR_RENAME_FAILED with EXDEV.
-    int ReplaceBy(TempFile &temp, std::string_view text, mode_t mode_of_new = 0666);
+    int ReplaceBy(TempFile &temp, std::string_view text, mode_t mode_of_new = 0644);
 
     // The first half of that, for callers who move several files together: the text, owner, mode and attributes go into
     // `temp`, which is synced and closed. False with errno.

@@ -1,8 +1,7 @@
 // Follows a path to the file that a rewrite replaces.
 #include "core/detail/file_target.h"
 
-#include "core/detail/open_file.h"
-#include "core/detail/owner.h"
+#include "core/detail/trusted_file.h"
 
 #include <climits>
 #include <cstdlib>

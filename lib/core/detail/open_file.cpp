@@ -1,17 +1,39 @@
 // Opens, writes and syncs files for a library that runs as root.
 #include "core/detail/open_file.h"
 
-#include <string>
-
 namespace tavo {
+namespace {
 
-Fd OpenFd(const char *path, int flags, mode_t mode) noexcept
+int Open(const char *path, int flags, mode_t mode) noexcept
 {
     for (;;) {
         const int fd = ::open(path, flags | O_CLOEXEC | O_NOCTTY | O_NONBLOCK, mode);
         if (fd >= 0 || errno != EINTR)
-            return Fd(fd);
+            return fd;
     }
+}
+
+}  // namespace
+
+Fd OpenFd(const char *path, int flags, mode_t mode) noexcept
+{
+    mode &= ~kWritableByOthers;
+    if ((flags & O_CREAT) == 0)
+        return Fd(Open(path, flags, mode));
+    if ((flags & O_EXCL) == 0) {
+        Fd existing(Open(path, flags & ~O_CREAT, mode));
+        if (existing || errno != ENOENT)
+            return existing;
+    }
+    Fd created(Open(path, flags | O_EXCL, mode));
+    if (created) {
+        KeepErrno keep;
+        static_cast<void>(::fchmod(created.Get(), mode));  // what a stricter umask took
+        return created;
+    }
+    if (errno != EEXIST || (flags & O_EXCL) != 0)
+        return Fd();
+    return Fd(Open(path, flags, mode));  // another process was faster, or a link leads to a file that is missing
 }
 
 Fd OpenRegular(const char *path, int flags, mode_t mode) noexcept
@@ -36,15 +58,6 @@ File OpenToRead(const char *path) noexcept
     if (file)
         fd.Release();
     return file;
-}
-
-bool IsInPublicDirectory(const char *path)
-{
-    const std::string_view whole = path;
-    const size_t slash = whole.rfind('/');
-    const std::string parent(slash == std::string_view::npos ? "." : slash == 0 ? "/" : whole.substr(0, slash));
-    struct stat st;
-    return ::stat(parent.c_str(), &st) == 0 && (st.st_mode & S_IWOTH) != 0;
 }
 
 Fd AboveStandard(Fd fd) noexcept

@@ -12,18 +12,19 @@
 
 namespace tavo {
 
-// open(2) with O_CLOEXEC, O_NOCTTY and O_NONBLOCK added; empty with errno on failure.
-Fd OpenFd(const char *path, int flags, mode_t mode = 0666) noexcept;
+// Nothing that the library creates may be written to by group or others. The caller's umask counts for nothing: settings
+// files of the appliance have the same modes whichever program made them.
+constexpr mode_t kWritableByOthers = S_IWGRP | S_IWOTH;
+
+// open(2) with O_CLOEXEC, O_NOCTTY and O_NONBLOCK added; empty with errno on failure. A file that it creates has exactly
+// the mode, less kWritableByOthers.
+Fd OpenFd(const char *path, int flags, mode_t mode = 0644) noexcept;
 
 // The same for a regular file only: EISDIR for a directory, EINVAL for anything else that is no regular file.
-Fd OpenRegular(const char *path, int flags, mode_t mode = 0666) noexcept;
+Fd OpenRegular(const char *path, int flags, mode_t mode = 0644) noexcept;
 
 // A read stream on a regular file; empty with errno on failure.
 File OpenToRead(const char *path) noexcept;
-
-// True when everybody may create names in the directory that holds `path`, as in /tmp: there a link or a foreign file
-// may be a trap. False when the directory cannot be looked at.
-bool IsInPublicDirectory(const char *path);
 
 // The same file on a descriptor above 2, out of the way of a child's standard descriptors: for a process that has closed its
 // own. Empty with errno on failure.

@@ -11,7 +11,9 @@ bool TempFile::CreateBeside(const std::string &target)
     Remove();
     path_ = target + ".XXXXXX";
     fd_.Reset(::mkostemp(path_.data(), O_CLOEXEC));
-    if (!fd_)
+    if (fd_)
+        ::fchmod(fd_.Get(), 0600);  // whatever the umask
+    else
         path_.clear();
     return static_cast<bool>(fd_);
 }

@@ -2,7 +2,8 @@
 #include "tavo_error.h"
 
 #include "core/detail/guard.h"
-#include "core/detail/log_file.h"
+#include "core/detail/open_file.h"
+#include "core/detail/trusted_file.h"
 
 extern "C" void TLIBErrLogInitial(const char *szPath)
 {
@@ -10,7 +11,7 @@ extern "C" void TLIBErrLogInitial(const char *szPath)
         return;
     tavo::GuardSilently(
         [&] {
-            const tavo::Fd fd = tavo::OpenLogFile(szPath, O_WRONLY | O_CREAT | O_TRUNC);
+            const tavo::Fd fd = tavo::OpenTrusted(szPath, O_WRONLY | O_CREAT | O_TRUNC);
             return fd && tavo::SyncFd(fd.Get());
         },
         false);

@@ -2,7 +2,8 @@
 #include "tavo_error.h"
 
 #include "core/detail/guard.h"
-#include "core/detail/log_file.h"
+#include "core/detail/open_file.h"
+#include "core/detail/trusted_file.h"
 
 #include <string>
 
@@ -30,7 +31,7 @@ extern "C" int TLIBErrLogSet(const char *szPath, const char *szMessage)
         return Fail(ERR_BAD_PARAMETERS, Line{33});
     return Guard([&] {
         const std::string line = LogLine(szMessage);
-        tavo::Fd fd = tavo::OpenLogFile(szPath, O_RDWR | O_CREAT | O_APPEND);
+        tavo::Fd fd = tavo::OpenTrusted(szPath, O_RDWR | O_CREAT | O_APPEND);
         if (!fd)
             return Fail(ERR_OPEN_FAILED, Line{38});
         if (!tavo::WriteAll(fd.Get(), line))

@@ -5,6 +5,7 @@
 #include "core/detail/owner.h"
 
 #include <fcntl.h>
+#include <sys/stat.h>
 
 extern "C" FILE *TLIBFileTempFileOpen(char *szTemplate)
 {
@@ -13,6 +14,7 @@ extern "C" FILE *TLIBFileTempFileOpen(char *szTemplate)
     tavo::Fd fd(::mkostemp(szTemplate, O_CLOEXEC));
     if (!fd)
         return FailNull(ERR_OPEN_FAILED, Line{45});
+    ::fchmod(fd.Get(), 0600);  // whatever the umask
     FILE *stream = ::fdopen(fd.Get(), "we");
     if (!stream) {
         ::unlink(szTemplate);

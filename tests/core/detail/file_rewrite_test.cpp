@@ -58,15 +58,19 @@ TEST_F(FileRewriteTest, KeepsOwnerModeAndAttributes)
     }
 }
 
-TEST_F(FileRewriteTest, CreatesWithTheModeThatTheUmaskLeaves)
+TEST_F(FileRewriteTest, CreatesWithTheSameModeUnderEveryUmask)
 {
-    const mode_t old = ::umask(027);
-    EXPECT_EQ(Rewrite(dir_ / "settings", "a\n"), 0);
-    EXPECT_EQ(Rewrite(dir_ / "secret", "a\n", 0600), 0);
-    EXPECT_EQ(::umask(old), 027u);
-    EXPECT_EQ(StateOf(dir_ / "settings").st_mode & 07777, 0640u);
-    EXPECT_EQ(StateOf(dir_ / "secret").st_mode & 07777, 0600u);
-    EXPECT_THAT(dir_.Names(), ElementsAre("secret", "settings"));
+    for (const mode_t mask : {0u, 022u, 027u, 0777u}) {
+        const mode_t old = ::umask(mask);
+        EXPECT_EQ(Rewrite(dir_ / "settings", "a\n", 0666), 0);
+        EXPECT_EQ(Rewrite(dir_ / "secret", "a\n", 0600), 0);
+        EXPECT_EQ(::umask(old), mask);
+        EXPECT_EQ(StateOf(dir_ / "settings").st_mode & 07777, 0644u) << mask;
+        EXPECT_EQ(StateOf(dir_ / "secret").st_mode & 07777, 0600u) << mask;
+        EXPECT_THAT(dir_.Names(), ElementsAre("secret", "settings"));
+        ::unlink((dir_ / "settings").c_str());
+        ::unlink((dir_ / "secret").c_str());
+    }
 }
 
 TEST_F(FileRewriteTest, FollowsLinksAndKeepsThem)

@@ -168,6 +168,20 @@ TEST(ErrorLog, TrapsInPublicDirectories)
 
     EXPECT_EQ(TLIBErrLogSet((private_dir + "/link").c_str(), "x"), 0);
     EXPECT_EQ(test::ReadFile(target), "mine\nx\n");
+
+    // A hard link is a second name of a file of ours, for instance of a settings file on the same disk.
+    const std::string hard = open_dir + "/hard", theirs = open_dir + "/theirs";
+    ASSERT_EQ(::link(target.c_str(), hard.c_str()), 0);
+    test::WriteFile(theirs, "theirs\n");
+    ASSERT_EQ(::chown(theirs.c_str(), 1000, 0), 0);
+    for (const std::string &path : {hard, theirs}) {
+        test::ForgetFault();
+        EXPECT_EQ(TLIBErrLogSet(path.c_str(), "x"), -1) << path;
+        EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "error_log_set", 38}));
+        TLIBErrLogInitial(path.c_str());
+    }
+    EXPECT_EQ(test::ReadFile(target), "mine\nx\n");
+    EXPECT_EQ(test::ReadFile(theirs), "theirs\n");
 }
 
 }  // namespace
