@@ -9,6 +9,9 @@
  * Sizes are counted in 32-bit words on every target: the header counts 24 bytes and an item slot 4. On a 64-bit host
  * the block is physically larger than nSize says, and every list grows at the same insertion as on the appliance.
  *
+ * A block whose nSize is smaller than the header was overwritten or never made: what would have to grow it refuses it as
+ * it refuses NULL, with ERR_BAD_PARAMETERS.
+ *
  * A list belongs to one thread at a time; nothing is locked. Indexes begin at 0. A code is recorded only with the
  * failures that name one.
  */

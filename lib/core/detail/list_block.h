@@ -26,6 +26,12 @@ constexpr size_t ListBlockBytes(int32_t size)
            wider_slot * static_cast<size_t>((size - kListHeader) / kListSlot);
 }
 
+// False for a block that was never made or has been overwritten: it cannot grow, since twice nothing is nothing.
+inline bool IsListBlock(const TLIBSZLIST *list)
+{
+    return list && list->nSize >= kListHeader;
+}
+
 inline char *ListEnd(const TLIBSZLIST *list)
 {
     return list->pszEmpty + 1;

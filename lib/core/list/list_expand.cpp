@@ -6,7 +6,7 @@
 
 extern "C" TLIBSZLIST *PslTLIBISzListExpand(TLIBSZLIST *pList)
 {
-    if (!pList)
+    if (!tavo::IsListBlock(pList))
         return FailNull(ERR_BAD_PARAMETERS);
     TLIBSZLIST *expanded = tavo::CopyList(pList, int64_t{2} * pList->nSize);
     if (!expanded)

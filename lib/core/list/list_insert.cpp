@@ -22,7 +22,7 @@ int PlaceInOrder(const TLIBSZLIST *list, const char *string)
 
 extern "C" int TLIBSzListInsert(TLIBSZLIST **ppList, int i, const char *sz)
 {
-    if (!ppList || !*ppList || !sz || i < 0)
+    if (!ppList || !tavo::IsListBlock(*ppList) || !sz || i < 0)
         return Fail(ERR_BAD_PARAMETERS, Line{45});
     if (!tavo::CanPlace(*ppList, sz))
         return Fail(ERR_BAD_PARAMETERS);
@@ -51,14 +51,14 @@ extern "C" int TLIBSzListInsert(TLIBSZLIST **ppList, int i, const char *sz)
 
 extern "C" int TLIBSzListPush(TLIBSZLIST **ppList, const char *sz)
 {
-    if (!ppList || !*ppList || !sz)
+    if (!ppList || !tavo::IsListBlock(*ppList) || !sz)
         return Fail(ERR_BAD_PARAMETERS, Line{131});
     return TLIBSzListInsert(ppList, (*ppList)->nItem, sz);
 }
 
 extern "C" int TLIBSzListUnshift(TLIBSZLIST **ppList, const char *sz)
 {
-    if (!ppList || !*ppList || !sz)
+    if (!ppList || !tavo::IsListBlock(*ppList) || !sz)
         return Fail(ERR_BAD_PARAMETERS, Line{167});
     return TLIBSzListInsert(ppList, 0, sz);
 }

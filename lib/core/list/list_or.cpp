@@ -71,7 +71,7 @@ TLIBSZLIST *UnionInPlace(TLIBSZLIST **a, const TLIBSZLIST *b)
 
 extern "C" TLIBSZLIST *PslTLIBSzListOr(TLIBSZLIST **ppA, const TLIBSZLIST *pB, int fFlags)
 {
-    if (!ppA || !*ppA || !pB)
+    if (!ppA || !tavo::IsListBlock(*ppA) || !tavo::IsListBlock(pB))
         return FailNull(ERR_BAD_PARAMETERS, Line{61});
     if (!tavo::CanMatch(*ppA, pB))
         return FailNull(ERR_BAD_PARAMETERS, Line{73});

@@ -8,7 +8,7 @@
 
 extern "C" int TLIBSzListSet(TLIBSZLIST **ppList, int i, const char *sz)
 {
-    if (!ppList || !tavo::HasItem(*ppList, i) || !sz)
+    if (!ppList || !tavo::IsListBlock(*ppList) || !tavo::HasItem(*ppList, i) || !sz)
         return Fail(ERR_BAD_PARAMETERS);
     if (tavo::IsSorted(*ppList) && !(tavo::CanOrder(*ppList, (*ppList)->fMode) && tavo::CanPlace(*ppList, sz)))
         return Fail(ERR_BAD_PARAMETERS);

@@ -2,11 +2,12 @@
 #include "tavo_list.h"
 
 #include "core/detail/fault.h"
+#include "core/detail/list_block.h"
 #include "core/detail/list_match.h"
 
 extern "C" TLIBSZLIST *PslTLIBSzListSub(TLIBSZLIST *pA, const TLIBSZLIST *pB, int fFlags)
 {
-    if (!pA || !pB)
+    if (!tavo::IsListBlock(pA) || !tavo::IsListBlock(pB))
         return FailNull(ERR_BAD_PARAMETERS, Line{58});
     if (!tavo::CanMatch(pA, pB))
         return FailNull(ERR_BAD_PARAMETERS, Line{68});

@@ -180,6 +180,42 @@ TEST(ListFind, BinarySearchTellsThePlace)
     EXPECT_EQ(TLIBSzListFind(list.get(), "c"), -1);
 }
 
+// Twice nothing is nothing: such a block would grow for ever.
+TEST(List, ABlockWithoutASizeIsRefused)
+{
+    const List list = MakeList({"a", "b"});
+    const List other = MakeList({"c"});
+    TLIBSZLIST *broken = list.get();
+    TLIBSZLIST *whole = other.get();
+    const std::string text(600, 'x');
+    const struct {
+        const char *name;
+        std::function<bool()> refused;
+    } rows[] = {
+        {"push", [&] { return TLIBSzListPush(&broken, text.c_str()) == -1; }},
+        {"insert", [&] { return TLIBSzListInsert(&broken, 0, text.c_str()) == -1; }},
+        {"unshift", [&] { return TLIBSzListUnshift(&broken, text.c_str()) == -1; }},
+        {"set", [&] { return TLIBSzListSet(&broken, 0, text.c_str()) == -1; }},
+        {"expand", [&] { return PslTLIBISzListExpand(broken) == nullptr; }},
+        {"union", [&] { return PslTLIBSzListOr(&broken, whole, 0) == nullptr; }},
+        {"union with it", [&] { return PslTLIBSzListOr(&whole, broken, TLIB_SZLIST_NEW) == nullptr; }},
+        {"intersection", [&] { return PslTLIBSzListAnd(broken, whole, TLIB_SZLIST_NEW) == nullptr; }},
+        {"difference", [&] { return PslTLIBSzListSub(broken, whole, TLIB_SZLIST_NEW) == nullptr; }},
+    };
+    const int32_t size = broken->nSize, free = broken->nFree;
+    for (const int32_t wrong : {0, 23, -1, INT_MIN}) {
+        broken->nSize = broken->nFree = wrong;
+        for (const auto &row : rows) {
+            test::ForgetFault();
+            EXPECT_TRUE(row.refused()) << row.name << " of " << wrong;
+            EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS) << row.name << " of " << wrong;
+        }
+    }
+    broken->nSize = size;
+    broken->nFree = free;
+    EXPECT_EQ(Items(broken), (std::vector<std::string>{"a", "b"}));
+}
+
 TEST(ListSets, KeepTheOrderOfTheFirst)
 {
     enum { kAnd, kOr, kSub };
