@@ -15,8 +15,12 @@
  * a child calls ErrTLIBFileCloseLock or ErrTLIBFileResetLock first and never ErrTLIBFileUnlock, which would free what
  * its parent holds. Programs that are executed inherit nothing, the files are close-on-exec.
  *
- * Anyone who may log in to the appliance may read the lock files and so hold up those who change settings; the lock
- * files guard against accidents among the appliance's own programs.
+ * Only the owner of a lock file may open it (mode 0600), because everybody who can open a file can hold its lock. On the
+ * appliance that owner is root, so a program of another user takes no lock: its requests fail at once with
+ * ERR_LOCK_FAILED, and so does every function of the library that needs a lock, those that only read included.
+ *
+ * A request that fails names the lock in the system log, with the process id and the name of a holder if /proc/locks
+ * shows one.
  *
  * Files: /tmp/lock/lock_* (created, locked)
  */
@@ -83,11 +87,12 @@ extern TAVO_API TLIBLOCKFILE rgslckList[21];
  * request fails at once and changes nothing.
  * timeout: seconds for which a request with TAVO_LOCK_NONBLOCKING is tried again, every 50 milliseconds (20 times a
  * second); 0 or less means one attempt.
- * Creates /tmp/lock (mode 0755) and the lock files (mode 0644) when they are missing. A lock file that was replaced
+ * Creates /tmp/lock (mode 0755) and the lock files (mode 0600) when they are missing. A lock file that was replaced
  * while it was waited for (by a cleaner of /tmp) is opened again, so that all holders hold the same file.
  * Returns 0, or -1 with nothing taken and
- *   ERR_LOCK_FAILED    not all of the locks could be had in time, a shared lock would have to become exclusive, or the
- *                      request names no way or an impossible one to take them
+ *   ERR_LOCK_FAILED    not all of the locks could be had in time; or, at once, the caller may not open a lock file, a
+ *                      shared lock would have to become exclusive, or the request names no way or an impossible one to
+ *                      take them
  *   ERR_CREATE_FAILED, ERR_OPEN_FAILED  as ErrTLIBILockCheckDir */
 TAVO_API int ErrTLIBFileLock(unsigned int request, int timeout);
 
@@ -105,12 +110,16 @@ TAVO_API int ErrTLIBFileCloseLock(void);
  * Returns 0, or -1 with ERR_UNLOCK_FAILED when a close failed; all are closed all the same. */
 TAVO_API int ErrTLIBFileResetLock(unsigned int mask);
 
-/* Creates /tmp/lock and every lock file that is missing. ErrTLIBFileLock does so itself.
+/* Creates /tmp/lock and every lock file that is missing, and takes the permissions of group and others from those that
+ * are not. ErrTLIBFileLock does so itself.
  * Everybody may create names in /tmp, so the directory must belong to root or to the caller and be writable to its owner
- * alone, and a lock file must be a regular file of one of the two; a symbolic link is never followed.
+ * alone, and a lock file must be a regular file of one of the two; a symbolic link is never followed. For root, anything
+ * at /tmp/lock that does not belong to root is renamed to "/tmp/lock.foreign-" and 16 random digits, which is logged,
+ * and the directory is created in its place.
  * Returns 0, or -1 with
- *   ERR_CREATE_FAILED  /tmp/lock cannot be created, is no directory, or is not to be trusted
- *   ERR_OPEN_FAILED    a lock file cannot be created, is no regular file, or is not to be trusted */
+ *   ERR_CREATE_FAILED  /tmp/lock cannot be created, is not a directory, or is not to be trusted
+ *   ERR_OPEN_FAILED    a lock file cannot be created, is not a regular file, or is not to be trusted
+ *   ERR_OUT_OF_MEMORY */
 TAVO_API int ErrTLIBILockCheckDir(void);
 
 TAVO_END_DECLS

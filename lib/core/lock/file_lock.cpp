@@ -2,6 +2,8 @@
 #include "tavo_lock.h"
 
 #include "core/detail/fault.h"
+#include "core/detail/lock_holder.h"
+#include "core/detail/log.h"
 #include "core/detail/open_file.h"
 
 #include <ctime>
@@ -18,8 +20,18 @@ constexpr long kRetryNanoseconds = 50'000'000;
 constexpr int kTicksPerSecond = 100;
 constexpr int kTicksPerRetry = 5;
 
-enum class Take { taken, not_opened, busy };
+enum class Take { taken, not_opened, not_allowed, busy };
+
+// Hopeless is what waiting cannot help: this process itself holds a shared lock that would have to become exclusive, or
+// it may not open the file.
 enum class Attempt { complete, incomplete, hopeless };
+
+// One attempt at a request.
+struct Taken {
+    unsigned locks = 0;                    // to be given back unless the attempt is complete
+    const TLIBLOCKFILE *missed = nullptr;  // the first lock that could not be had
+    int error = 0;                         // why its file could not be opened
+};
 
 bool IsMode(unsigned mode)
 {
@@ -53,6 +65,8 @@ Take TakeFile(TLIBLOCKFILE &entry, unsigned mode)
     // A cleaner of /tmp may replace the file between open and flock; then the lock excludes nobody.
     for (int tries = 0; tries < 10; ++tries) {
         Fd fd = tavo::OpenRegular(entry.szPath, O_RDONLY | O_NOFOLLOW);
+        if (!fd && errno == EACCES)
+            return Take::not_allowed;
         if (!fd && (errno != ENOENT || ErrTLIBILockCheckDir() != 0))
             return Take::not_opened;
         if (!fd)
@@ -73,26 +87,48 @@ Take TakeFile(TLIBLOCKFILE &entry, unsigned mode)
     return Take::not_opened;
 }
 
-// Hopeless is what waiting cannot help: this process itself holds a shared lock that would have to become exclusive.
-Attempt TakeAll(unsigned wanted, unsigned mode, unsigned &taken)
+Attempt TakeAll(unsigned wanted, unsigned mode, Taken &taken)
 {
     for (TLIBLOCKFILE *entry = rgslckList; entry->fLockBit != 0; ++entry) {
         if ((entry->fLockBit & wanted) == 0)
             continue;
         if (!entry->pfLock) {
             const Take take = TakeFile(*entry, mode);
+            if (take != Take::taken && !taken.missed) {
+                taken.missed = entry;
+                taken.error = take == Take::busy ? 0 : errno;
+            }
             if (take == Take::busy)
                 return Attempt::incomplete;
+            if (take == Take::not_allowed)
+                return Attempt::hopeless;
             if (take == Take::not_opened)
                 continue;
         } else if (IsExclusive(mode) && !IsExclusive(static_cast<unsigned>(entry->nMode))) {
+            taken.missed = entry;
             return Attempt::hopeless;
         } else {
             ++entry->nRef;
         }
-        taken |= entry->fLockBit;
+        taken.locks |= entry->fLockBit;
     }
-    return taken == wanted ? Attempt::complete : Attempt::incomplete;
+    return taken.locks == wanted ? Attempt::complete : Attempt::incomplete;
+}
+
+// Without this line nobody finds out which of a dozen programs keeps the others waiting.
+void LogMissed(const Taken &taken)
+{
+    if (!taken.missed)
+        return;
+    const char *const path = taken.missed->szPath;
+    if (taken.missed->pfLock) {
+        LogError("%s:%d Gave up on %s: this process holds it shared, which does not become exclusive", path);
+    } else if (taken.error != 0) {
+        LogError("%s:%d Gave up on %s: it cannot be opened, errno=%d", path, taken.error);
+    } else {
+        const tavo::LockHolder holder = tavo::FindLockHolder(path);
+        LogError("%s:%d Gave up on %s: process %d (%s) holds it", path, holder.pid, holder.name);
+    }
 }
 
 void SleepThroughSignals(long nanoseconds)
@@ -113,13 +149,15 @@ extern "C" int ErrTLIBFileLock(unsigned int request, int timeout)
     if (!IsMode(mode))
         return Fail(ERR_LOCK_FAILED, Line{87});
     for (long long ticks = static_cast<long long>(timeout) * kTicksPerSecond;; ticks -= kTicksPerRetry) {
-        unsigned taken = 0;
+        Taken taken;
         const Attempt attempt = TakeAll(wanted, mode, taken);
         if (attempt == Attempt::complete)
             return 0;
-        ErrTLIBFileUnlock(taken);
-        if (attempt == Attempt::hopeless || ticks <= 0)
+        ErrTLIBFileUnlock(taken.locks);
+        if (attempt == Attempt::hopeless || ticks <= 0) {
+            LogMissed(taken);
             return Fail(ERR_LOCK_FAILED, Line{87});
+        }
         SleepThroughSignals(kRetryNanoseconds);
     }
 }

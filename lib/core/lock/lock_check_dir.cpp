@@ -1,14 +1,12 @@
 // Creates the directory of the lock files and every lock file that is missing.
 //
-// Everybody may create names in /tmp, before the appliance does. Root follows no link there, waits for no FIFO, and takes
-// no lock in a directory in which somebody else could exchange the files.
+// Everybody may create names in /tmp, before the appliance does. Root follows no link there, waits for no FIFO, takes no
+// lock in a directory in which somebody else could exchange the files, and moves a stranger's directory out of the way.
 #include "tavo_lock.h"
 
-#include "core/detail/fault.h"
-#include "core/detail/owner.h"
-
-#include <fcntl.h>
-#include <sys/stat.h>
+#include "core/detail/guard.h"
+#include "core/detail/log.h"
+#include "core/detail/trusted_file.h"
 
 namespace {
 
@@ -16,14 +14,15 @@ using tavo::Fd;
 
 constexpr char kDirectory[] = "/tmp/lock";
 constexpr mode_t kDirectoryMode = 0755;
-constexpr mode_t kFileMode = 0644;  // programs without privileges lock what they read, too
+constexpr mode_t kFileMode = 0600;  // whoever may read the file may hold its lock for ever
+constexpr int kTries = 64;          // against somebody who takes the name again and again
 
 bool IsOwnerTrusted(const struct stat &st)
 {
     return st.st_uid == 0 || st.st_uid == ::geteuid();
 }
 
-Fd OpenDirectory()
+Fd OpenOrCreateDirectory()
 {
     Fd fd(::open(kDirectory, O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
     if (!fd && errno == ENOENT) {
@@ -40,10 +39,29 @@ Fd OpenDirectory()
     return fd;
 }
 
+Fd OpenDirectory()
+{
+    for (int tries = 0; tries < kTries; ++tries) {
+        Fd fd = OpenOrCreateDirectory();
+        if (fd || ::geteuid() != 0)
+            return fd;
+        const std::string aside = tavo::MoveForeignAside(kDirectory);
+        if (aside.empty())
+            return Fd();
+        LogError("%s:%d %s did not belong to root and was renamed to %s", kDirectory, aside);
+    }
+    return Fd();
+}
+
 bool IsLockFile(int directory, const char *name)
 {
     struct stat st;
-    return ::fstatat(directory, name, &st, AT_SYMLINK_NOFOLLOW) == 0 && S_ISREG(st.st_mode) && IsOwnerTrusted(st);
+    if (::fstatat(directory, name, &st, AT_SYMLINK_NOFOLLOW) != 0 || !S_ISREG(st.st_mode) || !IsOwnerTrusted(st))
+        return false;
+    // Earlier releases let everybody read the lock files. Nobody else can exchange them in this directory.
+    if ((st.st_mode & 077) != 0 && st.st_uid == ::geteuid())
+        ::fchmodat(directory, name, kFileMode, 0);
+    return true;
 }
 
 bool CreateLockFile(int directory, const char *name)
@@ -59,13 +77,15 @@ bool CreateLockFile(int directory, const char *name)
 
 extern "C" int ErrTLIBILockCheckDir(void)
 {
-    const Fd directory = OpenDirectory();
-    if (!directory)
-        return Fail(ERR_CREATE_FAILED, Line{37});
-    for (const TLIBLOCKFILE *entry = rgslckList; entry->fLockBit != 0; ++entry) {
-        const char *const name = entry->szPath + sizeof kDirectory;
-        if (!IsLockFile(directory.Get(), name) && !CreateLockFile(directory.Get(), name))
-            return Fail(ERR_OPEN_FAILED, Line{45});
-    }
-    return 0;
+    return Guard([] {
+        const Fd directory = OpenDirectory();
+        if (!directory)
+            return Fail(ERR_CREATE_FAILED, Line{37});
+        for (const TLIBLOCKFILE *entry = rgslckList; entry->fLockBit != 0; ++entry) {
+            const char *const name = entry->szPath + sizeof kDirectory;
+            if (!IsLockFile(directory.Get(), name) && !CreateLockFile(directory.Get(), name))
+                return Fail(ERR_OPEN_FAILED, Line{45});
+        }
+        return 0;
+    });
 }

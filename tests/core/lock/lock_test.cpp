@@ -2,12 +2,16 @@
 #include "tavo_lock.h"
 
 #include "support/appliance_root.h"
+#include "support/captured_log.h"
 #include "support/descriptors.h"
+#include "support/eventually.h"
 #include "support/failing_malloc.h"
 #include "support/fault_state.h"
 #include "support/own_child.h"
+#include "support/planted_name.h"
+#include "support/scratch_dir.h"
 
-#include <gtest/gtest.h>
+#include <gmock/gmock.h>
 
 #include <cerrno>
 #include <climits>
@@ -22,6 +26,7 @@
 
 #include <fcntl.h>
 #include <sys/file.h>
+#include <sys/prctl.h>
 #include <sys/stat.h>
 #include <sys/syscall.h>
 #include <sys/wait.h>
@@ -30,6 +35,8 @@
 namespace fs = std::filesystem;
 using test::Fault;
 using test::LastFault;
+using testing::ElementsAre;
+using testing::EndsWith;
 
 namespace {
 
@@ -328,15 +335,18 @@ TEST_F(Lock, CloseReportsAFailure)
 
 TEST_F(Lock, DirectoryAndFilesAreMadeWhateverTheUmask)
 {
-    const mode_t mask = ::umask(077);
+    const mode_t mask = ::umask(0777);
     EXPECT_EQ(ErrTLIBFileLock(0x806, 0), 0);
     ::umask(mask);
+    ErrTLIBFileUnlock(0x800);
+    ASSERT_EQ(::chmod("/tmp/lock/lock_pw", 0644), 0) << "as earlier releases made them";
+    EXPECT_EQ(ErrTLIBILockCheckDir(), 0);
     struct stat st;
     ASSERT_EQ(::stat("/tmp/lock", &st), 0);
     EXPECT_EQ(st.st_mode, S_IFDIR | 0755u);
     for (const TLIBLOCKFILE *entry = rgslckList; entry->fLockBit; ++entry) {
         ASSERT_EQ(::lstat(entry->szPath, &st), 0) << entry->szPath;
-        EXPECT_EQ(st.st_mode, S_IFREG | 0644u) << entry->szPath;
+        EXPECT_EQ(st.st_mode, S_IFREG | 0600u) << entry->szPath;
         EXPECT_EQ(st.st_size, 0);
     }
     ASSERT_EQ(::unlink("/tmp/lock/lock_smb"), 0);
@@ -348,9 +358,8 @@ TEST_F(Lock, TrapsAtTheDirectory)
 {
     fs::create_directory("/tmp/elsewhere");
     ASSERT_EQ(::chmod("/tmp/elsewhere", 0700), 0);
-    for (const char *plant :
-         {"ln -s /tmp/elsewhere /tmp/lock", "ln -s /tmp/nowhere /tmp/lock", ": >/tmp/lock", "mkfifo /tmp/lock",
-          "mkdir -m 1777 /tmp/lock", "mkdir -m 775 /tmp/lock", "mkdir /tmp/lock && chown 1000 /tmp/lock"}) {
+    for (const char *plant : {"ln -s /tmp/elsewhere /tmp/lock", "ln -s /tmp/nowhere /tmp/lock", ": >/tmp/lock",
+                              "mkfifo /tmp/lock", "mkdir -m 1777 /tmp/lock", "mkdir -m 775 /tmp/lock"}) {
         ASSERT_EQ(std::system(plant), 0) << plant;
         test::ForgetFault();
         EXPECT_EQ(ErrTLIBFileLock(0x806, 0), -1) << plant;
@@ -363,6 +372,73 @@ TEST_F(Lock, TrapsAtTheDirectory)
     ASSERT_EQ(::stat("/tmp/elsewhere", &st), 0);
     EXPECT_EQ(st.st_mode & 07777u, 0700u);
     fs::remove_all("/tmp/elsewhere");
+}
+
+// Somebody may have created the name before the appliance does. That stops no call of root's and makes it touch nothing
+// that it does not know.
+TEST_F(Lock, MovesAsideWhatIsNotRoots)
+{
+    for (const test::Plant plant : test::kPlants) {
+        test::PlantAt("/tmp/lock", plant);
+        struct stat before, after;
+        ASSERT_EQ(::lstat("/tmp/lock", &before), 0);
+        const test::CapturedLog log;
+        EXPECT_EQ(ErrTLIBFileLock(0x806, 0), 0) << plant;
+        EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS) << plant;
+        const std::string aside = test::MovedAside("/tmp/lock");
+        ASSERT_EQ(::lstat(aside.c_str(), &after), 0) << plant;
+        EXPECT_EQ(after.st_ino, before.st_ino) << plant;
+        EXPECT_THAT(log.Texts(), ElementsAre(EndsWith(" /tmp/lock did not belong to root and was renamed to " + aside)))
+            << plant;
+        test::RemovePlanted(aside);
+        Forget();
+    }
+    EXPECT_EQ(test::ReadFile("/tmp/lock.target"), "kept");
+    test::RemovePlanted("/tmp/lock");
+}
+
+// Reading a file is enough to hold its lock for ever, so nobody else may open one.
+TEST_F(Lock, OtherUsersTakeNoneAndDoNotWait)
+{
+    ASSERT_EQ(ErrTLIBILockCheckDir(), 0);
+    EXPECT_EQ(test::InChild([] {
+                  const test::CapturedLog log;
+                  if (::setresuid(1000, 1000, 1000) != 0 || ::open("/tmp/lock/lock_pw", O_RDONLY) >= 0)
+                      return 1;
+                  const bool refused = ErrTLIBFileLock(0x815, 60) == -1 &&
+                                       LastFault() == Fault{ERR_LOCK_FAILED, "file_lock", 87} && sleeps.empty();
+                  return refused && log.Texts().size() == 1 &&
+                                 log.Texts()[0].ends_with("Gave up on /tmp/lock/lock_tavoinfo: it cannot be opened, "
+                                                          "errno=13")
+                             ? 0
+                             : 2;
+              }),
+              0);
+}
+
+TEST_F(Lock, WhoGivesUpNamesALockAndItsHolder)
+{
+    SKIP_WITHOUT_PROC();
+    ASSERT_EQ(ErrTLIBILockCheckDir(), 0);
+    for (const int operation : {LOCK_EX, LOCK_SH}) {
+        test::OwnChild holder([&] {
+            ::prctl(PR_SET_NAME, "busy daemon");
+            const int fd = ::open("/tmp/lock/lock_host", O_RDONLY);
+            syscall(SYS_flock, fd, operation);
+            ::pause();
+        });
+        ASSERT_TRUE(test::Eventually([] { return !IsFree(0x100, LOCK_EX); }));
+        const test::CapturedLog log;
+        EXPECT_EQ(ErrTLIBFileLock(0x906, 1), -1);
+        EXPECT_THAT(log.Texts(), ElementsAre(EndsWith("Gave up on /tmp/lock/lock_host: process " +
+                                                      std::to_string(holder.Pid()) + " (busy daemon) holds it")));
+    }
+    ASSERT_EQ(ErrTLIBFileLock(0x105, 0), 0);
+    const test::CapturedLog log;
+    EXPECT_EQ(ErrTLIBFileLock(0x106, 5), -1);
+    EXPECT_THAT(log.Texts(), ElementsAre(EndsWith(
+                                 "Gave up on /tmp/lock/lock_host: this process holds it shared, which does not become "
+                                 "exclusive")));
 }
 
 TEST_F(Lock, TrapsAtALockFile)
