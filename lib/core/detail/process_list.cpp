@@ -1,22 +1,16 @@
 // The process table as /proc shows it.
 #include "core/detail/process_list.h"
 
-#include "core/detail/owner.h"
+#include "core/detail/folder_reader.h"
 
 #include <algorithm>
 #include <charconv>
-#include <memory>
 #include <new>
 
-#include <dirent.h>
 #include <fcntl.h>
 
 namespace tavo {
 namespace {
-
-struct CloseDirectory {
-    void operator()(DIR *directory) const noexcept { ::closedir(directory); }
-};
 
 // A small file of /proc; empty when the process has gone meanwhile.
 std::string ReadSmall(int proc, const std::string &name)
@@ -76,23 +70,19 @@ std::string Command(int proc, const std::string &pid)
 std::vector<Process> ListProcesses()
 {
     std::vector<Process> processes;
-    Fd fd(::open("/proc", O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-    if (!fd)
-        return processes;
-    const std::unique_ptr<DIR, CloseDirectory> directory(::fdopendir(fd.Get()));
-    if (!directory)
-        throw std::bad_alloc();  // an empty table would say that nobody runs
-    const int proc = fd.Release();
-    while (const dirent *entry = ::readdir(directory.get())) {
-        const std::string name = entry->d_name;
+    FolderReader proc("/proc");
+    while (const char *const entry = proc.Next()) {
+        const std::string name = entry;
         pid_t pid = 0;
         const auto [end, error] = std::from_chars(name.data(), name.data() + name.size(), pid);
         if (error != std::errc() || *end != 0 || pid < 1)
             continue;
-        std::string command = Command(proc, name);
+        std::string command = Command(proc.Descriptor(), name);
         if (!command.empty())
             processes.push_back({pid, std::move(command)});
     }
+    if (proc.Failed() && errno != ENOENT)
+        throw std::bad_alloc();  // half a table would say that some do not run
     std::sort(processes.begin(), processes.end(), [](const Process &a, const Process &b) { return a.pid < b.pid; });
     return processes;
 }
