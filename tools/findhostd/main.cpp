@@ -3,6 +3,7 @@
 // Two processes: one listens to the network and has no rights, one writes the list and never hears the network.
 #include "network_part.h"
 #include "root_part.h"
+#include "standard_descriptors.h"
 
 #include "tavo_file.h"
 
@@ -189,6 +190,7 @@ int Serve(int verdict)
 
 int main(int argc, char **argv)
 {
+    FillStandardDescriptors();
     const bool foreground = argc == 2 && std::strcmp(argv[1], "--foreground") == 0;
     if (argc > 1 && !foreground) {
         std::fprintf(stderr,

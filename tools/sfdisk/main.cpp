@@ -2,6 +2,7 @@
 #include "block_target.h"
 #include "commands.h"
 #include "options.h"
+#include "standard_descriptors.h"
 
 #include <cstdio>
 #include <exception>
@@ -30,6 +31,7 @@ int Run(const sfdisk::Options &options)
 
 int main(int argc, char **argv)
 {
+    FillStandardDescriptors();
     std::string complaint;
     const auto options = sfdisk::ParseOptions({argv + 1, argv + argc}, complaint);
     if (!options) {

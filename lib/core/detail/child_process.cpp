@@ -1,11 +1,15 @@
 // Starts a program in a child process.
 #include "core/detail/child_process.h"
 
+#include "tavo_lock.h"
+
+#include "core/detail/child_status.h"
 #include "core/detail/owner.h"
 
 #include <algorithm>
 #include <climits>
 #include <csignal>
+#include <cstdio>
 
 #include <fcntl.h>
 #include <sys/resource.h>
@@ -38,8 +42,11 @@ bool SetStandardDescriptors(const ChildPlan &plan)
     int null_device = -1;
     for (int fd = 0; fd <= 2; ++fd) {
         int source = plan.standard[fd];
-        if (source == kInherited)
+        if (source == kInherited && ::fcntl(fd, F_GETFD) >= 0)
             continue;
+        // The first file that the program opens must not become its output.
+        if (source == kInherited)
+            source = kNullDevice;
         if (source == kNullDevice) {
             if (null_device < 0 && (null_device = ::open("/dev/null", O_RDWR | O_NOCTTY)) < 0)
                 return false;
@@ -85,8 +92,19 @@ void SetSignals(const ChildPlan &plan, const sigset_t &parent_mask)
     ::sigprocmask(SIG_SETMASK, &mask, nullptr);
 }
 
+// While a copy waits for its program it must not hold on to locks that its parent loses.
+void CloseLocks()
+{
+    for (const TLIBLOCKFILE *entry = rgslckList; entry->fLockBit != 0; ++entry) {
+        if (entry->pfLock)
+            ::close(::fileno(entry->pfLock));
+    }
+}
+
 [[noreturn]] void RunChild(const ChildPlan &plan, const sigset_t &parent_mask)
 {
+    if (plan.copy)
+        CloseLocks();
     if (!SetStandardDescriptors(plan))
         GiveUp(plan);
     if (plan.new_session)
@@ -103,7 +121,7 @@ void SetSignals(const ChildPlan &plan, const sigset_t &parent_mask)
 
 [[gnu::noinline]] pid_t Fork(const ChildPlan &plan, const sigset_t &parent_mask)
 {
-    const pid_t pid = ::vfork();
+    const pid_t pid = plan.copy ? ::fork() : ::vfork();
     if (pid == 0)
         RunChild(plan, parent_mask);
     return pid;
@@ -113,6 +131,7 @@ void SetSignals(const ChildPlan &plan, const sigset_t &parent_mask)
 
 pid_t StartChild(const ChildPlan &plan) noexcept
 {
+    ReapLeftChildren();
     sigset_t all, parent_mask;
     sigfillset(&all);
     ::pthread_sigmask(SIG_BLOCK, &all, &parent_mask);

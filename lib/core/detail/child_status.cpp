@@ -6,6 +6,14 @@
 #include <sys/wait.h>
 
 namespace tavo {
+namespace {
+
+constexpr int kMostLeft = 16;
+
+constinit pid_t left_children[kMostLeft] = {};
+constinit int next_left = 0;
+
+}  // namespace
 
 int ExitResult(int wait_status) noexcept
 {
@@ -20,6 +28,22 @@ int CollectChild(pid_t pid) noexcept
             return errno == ECHILD ? 0 : -1;
     }
     return ExitResult(status);
+}
+
+void LeaveChild(pid_t pid) noexcept
+{
+    left_children[next_left] = pid;
+    next_left = (next_left + 1) % kMostLeft;
+}
+
+void ReapLeftChildren() noexcept
+{
+    KeepErrno keep;
+    for (pid_t &child : left_children) {
+        // In a forked child it is not its child: ECHILD.
+        if (child > 0 && ::waitpid(child, nullptr, WNOHANG) != 0)
+            child = 0;
+    }
 }
 
 KeepChildStatus::KeepChildStatus() noexcept

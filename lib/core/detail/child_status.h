@@ -28,6 +28,11 @@ class KeepChildStatus {
     bool changed_;
 };
 
+// Remembers a child that has been killed and does not die, because it waits in the kernel for a disk. A later call that
+// starts a program collects it, so that it stays no zombie for ever. Of many such children the latest are remembered.
+void LeaveChild(pid_t pid) noexcept;
+void ReapLeftChildren() noexcept;
+
 // Collects what has ended of the children that a process which ignores SIGCHLD does not want to hear of.
 void SweepZombies() noexcept;
 

@@ -59,9 +59,7 @@ bool IsLockFile(int directory, const char *name)
     if (::fstatat(directory, name, &st, AT_SYMLINK_NOFOLLOW) != 0 || !S_ISREG(st.st_mode) || !IsOwnerTrusted(st))
         return false;
     // Earlier releases let everybody read the lock files. Nobody else can exchange them in this directory.
-    if ((st.st_mode & 077) != 0 && st.st_uid == ::geteuid())
-        ::fchmodat(directory, name, kFileMode, 0);
-    return true;
+    return (st.st_mode & 077) == 0 || st.st_uid != ::geteuid() || ::fchmodat(directory, name, kFileMode, 0) == 0;
 }
 
 bool CreateLockFile(int directory, const char *name)

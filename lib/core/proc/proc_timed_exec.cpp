@@ -19,8 +19,8 @@ namespace {
 using std::chrono::seconds;
 using tavo::ChildBell;
 
-// A killed program that hangs in the kernel (a dead disk) is left behind after this long.
-constexpr seconds kPatience{5};
+// How long a killed program may take to die. One that hangs in the kernel (a dead disk) is left to a later call.
+constexpr seconds kPatience{1};
 
 // The result of the child when it has ended.
 std::optional<int> TryCollect(pid_t pid)
@@ -74,19 +74,21 @@ extern "C" int TLIBTimedExec(int cSeconds, const char *szProgram, ...)
     va_end(list);
     const tavo::PathOnlyEnvironment environment;
 
-    ChildBell bell;
     const ChildBell::Clock::time_point deadline = ChildBell::Clock::now() + seconds(cSeconds);
+    ChildBell bell;
     const pid_t pid = tavo::StartChild({.program = szProgram,
                                         .arguments = arguments.Vector(),
                                         .environment = environment.Variables(),
                                         .new_session = true,
                                         .root_directory = true,
-                                        .default_signals = true});
+                                        .default_signals = true,
+                                        .copy = true});
     if (pid < 0)
         return Fail(ERR_OP_FAILURE);
     if (const std::optional<int> result = CollectBefore(deadline, bell, pid))
         return *result == -1 ? Fail(ERR_OP_FAILURE) : *result;
     Kill(pid);
-    CollectBefore(ChildBell::Clock::now() + kPatience, bell, pid);
+    if (!CollectBefore(ChildBell::Clock::now() + kPatience, bell, pid))
+        tavo::LeaveChild(pid);
     return Fail(ERR_TIMER_EXPIRED);
 }

@@ -90,6 +90,29 @@ TEST(ToolWords, GoToTheLogAfterTheLinesOfTheCaller)
     EXPECT_EQ(text, "3 stated\n7 third\n7 first\n7 se\\x1Bcond\n");
 }
 
+// A daemon may have closed its standard descriptors. The first file that a tool opens, such as a disk, must not become
+// its standard output.
+TEST(RunCommand, ClosedStandardDescriptorsAreTheNullDevice)
+{
+    const test::ScratchDir dir;
+    const std::string command =
+        "a=$(readlink /proc/$$/fd/0); b=$(readlink /proc/$$/fd/1); c=$(readlink /proc/$$/fd/2); "
+        "echo $a $b $c >" +
+        dir / "descriptors";
+    for (const std::vector<int> &closed : {std::vector<int>{0, 1, 2}, {1}, {2}, {1, 2}, {0, 2}}) {
+        EXPECT_EQ(test::InChild([&] {
+                      const int null = ::open("/dev/null", O_RDWR | O_CLOEXEC);
+                      for (const int fd : {0, 1, 2})
+                          ::dup2(null, fd);
+                      for (const int fd : closed)
+                          ::close(fd);
+                      return RunCommand(command);
+                  }),
+                  0);
+        EXPECT_EQ(test::ReadFile(dir / "descriptors"), "/dev/null /dev/null /dev/null\n") << closed.size();
+    }
+}
+
 // A caller that ignores SIGCHLD never waits: what ended while a command ran must not stay behind as a zombie.
 TEST(RunCommand, LeavesNoZombieOfAnIgnoringCaller)
 {

@@ -1,7 +1,11 @@
 // Running programs for a limited time.
 #include "tavo_proc.h"
 
+#include "tavo_lock.h"
+
+#include "support/appliance_root.h"
 #include "support/captured_log.h"
+#include "support/eventually.h"
 #include "support/fault_state.h"
 #include "support/own_child.h"
 #include "support/scratch_dir.h"
@@ -15,15 +19,30 @@
 #include <string>
 #include <vector>
 
+#include <dlfcn.h>
 #include <fcntl.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
+#include <sys/syscall.h>
 #include <syslog.h>
 
 using test::ChildAction;
 using test::Fault;
 using test::LastFault;
 using namespace std::chrono_literals;
+
+namespace {
+
+bool undying = false;  // nobody sees a child end
+
+}  // namespace
+
+extern "C" pid_t waitpid(pid_t pid, int *status, int options)
+{
+    if (undying && (options & WNOHANG) != 0)
+        return 0;
+    return static_cast<pid_t>(::syscall(SYS_wait4, pid, status, options, nullptr));
+}
 
 namespace {
 
@@ -241,6 +260,106 @@ TEST(TimedExec, ThePipeIsTheProcessesOwn)
               }),
               0);
     EXPECT_EQ(test::ReadFile(path), "");
+}
+
+// A program that cannot be read for now, as from a disk that does not answer: somebody else holds a lease on it, which
+// the kernel lets run out after 45 seconds.
+class HeldUpProgram {
+  public:
+    HeldUpProgram()
+    {
+        test::WriteFile(path_, "#!/bin/sh\nexit 0\n", 0755);
+        holder_ = std::make_unique<test::OwnChild>([this] {
+            ::signal(SIGIO, SIG_IGN);
+            const int fd = ::open(path_.c_str(), O_RDWR | O_CLOEXEC);
+            const char *const name = ::fcntl(fd, F_SETLEASE, F_WRLCK) == 0 ? "held" : "not held";
+            ::close(::open((dir_ / name).c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0644));
+            ::pause();
+        });
+        EXPECT_TRUE(test::Eventually([this] { return dir_.Names().size() == 2; }));
+    }
+
+    const char *Path() const { return path_.c_str(); }
+    bool IsHeldUp() const { return ::access((dir_ / "held").c_str(), F_OK) == 0; }
+
+  private:
+    const test::ScratchDir dir_;
+    const std::string path_ = dir_ / "program";
+    std::unique_ptr<test::OwnChild> holder_;
+};
+
+TEST(TimedExec, TheLimitCountsWhileTheProgramIsRead)
+{
+    const HeldUpProgram program;
+    if (!program.IsHeldUp())
+        GTEST_SKIP() << "no leases on this file system";
+    int result = 0;
+    const auto time = TimeOf([&] { result = TLIBTimedExec(1, program.Path(), NULL); });
+    EXPECT_EQ(result, -1);
+    EXPECT_EQ(LastFault(), kExpired);
+    EXPECT_GE(time, 990ms);
+    EXPECT_LT(time, 4s);
+}
+
+// What waits for a dead disk does not die, and the caller does not wait for it.
+TEST(TimedExec, AChildThatCannotBeKilledIsLeftToALaterCall)
+{
+    undying = true;
+    const auto time = TimeOf([] { EXPECT_EQ(TLIBTimedExec(1, "/bin/sleep", "60", NULL), -1); });
+    undying = false;
+    EXPECT_EQ(LastFault(), kExpired);
+    EXPECT_LT(time, 5s);
+    siginfo_t left = {};
+    EXPECT_EQ(::waitid(P_ALL, 0, &left, WEXITED | WNOWAIT), 0) << "the case needs a child that is left";
+    EXPECT_EQ(TLIBExec("/bin/true", NULL), 0);
+    EXPECT_TRUE(test::HasNoChildren());
+}
+
+// The child of a program that waits must not hold what its parent has released by dying.
+TEST(TimedExec, ACopyOfTheCallerHoldsNoLock)
+{
+    if (test::RootForm().empty())
+        GTEST_SKIP() << "only in an appliance root";
+    const HeldUpProgram program;
+    if (!program.IsHeldUp())
+        GTEST_SKIP() << "no leases on this file system";
+    {
+        test::OwnChild caller([&] {
+            if (ErrTLIBFileLock(TAVO_LOCK_RC | TAVO_LOCK_EXCLUSIVE, 0) == 0)
+                TLIBTimedExec(60, program.Path(), NULL);
+        });
+        ASSERT_TRUE(test::Eventually([] {
+            const bool held = ErrTLIBFileLock(TAVO_LOCK_RC | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING, 0) != 0;
+            if (!held)
+                ErrTLIBFileUnlock(TAVO_LOCK_RC);
+            return held;
+        }));
+        ::usleep(300000);  // the copy is at its program
+    }
+    EXPECT_EQ(ErrTLIBFileLock(TAVO_LOCK_RC | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING, 2), 0);
+    ErrTLIBFileUnlock(TAVO_LOCK_RC);
+}
+
+// A host may load the library, use it and unload it again. What it has installed must stay where it is.
+TEST(TimedExec, TheHandlerOutlivesAnUnloadedLibrary)
+{
+#if defined(__SANITIZE_ADDRESS__)
+    GTEST_SKIP() << "the sanitizer knows one copy of a library";
+#endif
+    Dl_info library;
+    ASSERT_NE(::dladdr(reinterpret_cast<const void *>(&TLIBTimedExec), &library), 0);
+    EXPECT_EQ(test::InChild([&] {
+                  void *const own = ::dlmopen(LM_ID_NEWLM, library.dli_fname, RTLD_NOW);
+                  if (!own)
+                      return 1;
+                  const auto timed_exec = reinterpret_cast<decltype(&TLIBTimedExec)>(::dlsym(own, "TLIBTimedExec"));
+                  if (!timed_exec || timed_exec(9, "/bin/true", NULL) != 0 || ::dlclose(own) != 0)
+                      return 2;
+                  if (::fork() == 0)
+                      ::_exit(0);
+                  return ::waitpid(-1, nullptr, 0) > 0 ? 0 : 3;
+              }),
+              0);
 }
 
 TEST(TimedExec, AbortsWithoutDescriptorsForThePipe)

@@ -304,6 +304,24 @@ TEST_F(Sfdisk, ChangesTheKindOfTableForAnEmptyOneAlone)
     EXPECT_THAT(other.out, testing::HasSubstr("label: dos"));
 }
 
+// Started by a daemon without standard descriptors, it opens the disk first: its remark must not become a part of it.
+TEST_F(Sfdisk, WritesNoRemarkOnTheDisk)
+{
+    Resize(4096 * kGiB);
+    PutSector(0, Table({}));
+    ASSERT_EQ(Run({"-N1", "-j256", "-z-1", "-t83"}).status, 0);
+    std::vector<std::string> expected;
+    for (off_t sector = 0; sector < 4; ++sector)
+        expected.push_back(Sector(sector));
+    const std::string without = "exec /sbin/sfdisk -N1 -j256 -z-1 -t83 \"$0\" ";
+    for (const char *closed : {"2>&-", ">&- 2>&-", "<&- >&- 2>&-"}) {
+        PutSector(0, Table({}));
+        EXPECT_EQ(test::RunningProgram("/bin/sh", {"-c", without + closed, image_}).Wait().status, 0) << closed;
+        for (off_t sector = 0; sector < 4; ++sector)
+            EXPECT_EQ(Sector(sector), expected[static_cast<size_t>(sector)]) << closed << " sector " << sector;
+    }
+}
+
 TEST_F(Sfdisk, RefusesWhatItDoesNotKnow)
 {
     const std::string before = Sector();

@@ -1,0 +1,21 @@
+// Standard input, output and error for programs that may be started without them.
+#ifndef TOOLS_STANDARD_DESCRIPTORS_H
+#define TOOLS_STANDARD_DESCRIPTORS_H
+
+#include <fcntl.h>
+#include <unistd.h>
+
+// Opens /dev/null in place of each of the descriptors 0 to 2 that is closed: otherwise the first file that the program
+// opens, such as a disk, becomes its standard output, and messages are written into it. First thing in main.
+inline void FillStandardDescriptors() noexcept
+{
+    for (;;) {
+        const int fd = ::open("/dev/null", O_RDWR | O_NOCTTY);
+        if (fd > 2)
+            ::close(fd);
+        if (fd < 0 || fd > 2)
+            return;
+    }
+}
+
+#endif
