@@ -8,20 +8,27 @@
 #include "core/detail/shell_command.h"
 
 #include <charconv>
+#include <cstring>
 #include <string>
 
 namespace {
 
-// The scratch file of the search, gone when it is.
+// grep's time grows with the square of the pattern's length.
+constexpr size_t kLongestPattern = 1024;
+
+// Scratch file; removed when the search ends.
 class ScratchFile {
   public:
     explicit ScratchFile(std::string path) : path_(std::move(path))
     {
-        // One of an earlier process with our pid is in the way; what belongs to somebody else is not ours to remove.
+        // A file of an earlier process with our pid is removed; files of other users are left alone.
         struct stat st;
         if (::lstat(path_.c_str(), &st) == 0 && st.st_uid == ::geteuid() && !S_ISDIR(st.st_mode))
             ::unlink(path_.c_str());
         fd_ = tavo::OpenFd(path_.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
+        is_taken_ = !fd_ && errno == EEXIST;
+        if (is_taken_)
+            fd_ = tavo::Fd(::mkostemp((path_ += ".XXXXXX").data(), O_CLOEXEC));
     }
     ~ScratchFile()
     {
@@ -33,6 +40,7 @@ class ScratchFile {
     ScratchFile &operator=(const ScratchFile &) = delete;
 
     explicit operator bool() const { return static_cast<bool>(fd_); }
+    bool IsTaken() const { return is_taken_; }
     const std::string &Path() const { return path_; }
 
     // The file as it stands under its name now, if it still is the one that was created.
@@ -41,7 +49,7 @@ class ScratchFile {
         tavo::Fd fd = tavo::OpenRegular(path_.c_str(), O_RDONLY | O_NOFOLLOW);
         struct stat created, named;
         if (!fd || ::fstat(fd_.Get(), &created) != 0 || ::fstat(fd.Get(), &named) != 0 ||
-            created.st_ino != named.st_ino)
+            created.st_dev != named.st_dev || created.st_ino != named.st_ino)
             return tavo::File();
         tavo::File stream(::fdopen(fd.Get(), "re"));
         if (stream)
@@ -52,6 +60,7 @@ class ScratchFile {
   private:
     std::string path_;
     tavo::Fd fd_;
+    bool is_taken_ = false;  // the usual name belongs to somebody else
 };
 
 // What is found, line by line.
@@ -105,22 +114,9 @@ void AddLines(std::FILE *stream, Search &search)
         throw std::bad_alloc();  // half a list would say that some do not run
 }
 
-int FindByPs(const std::string &pattern, pid_t *pids, int capacity)
+// Where ps cannot serve.
+int FindInProcessTable(const std::string &pattern, Search &search)
 {
-    const ScratchFile scratch("/tmp/tempTLIBPs" + std::to_string(::getpid()));
-    if (!scratch)
-        return Fail(ERR_READ_FAILED);
-    Search search(pattern, pids, capacity);
-    if (const auto command = tavo::ShellCommand("/bin/ps -I | /bin/grep '%s' > %s 2>&1", pattern, scratch.Path()))
-        tavo::RunCommandQuietly(*command);
-    const tavo::File found = scratch.Reopen();
-    if (!found)
-        return Fail(ERR_READ_FAILED);
-    AddLines(found.Get(), search);
-    if (search.HasListed())
-        return search.Count();
-
-    // Most machines' ps does not know -I.
     for (const tavo::Process &process : tavo::ListProcesses()) {
         const std::string line = ProcessLine(process);
         if (line.find(pattern) != std::string::npos)
@@ -129,11 +125,27 @@ int FindByPs(const std::string &pattern, pid_t *pids, int capacity)
     return search.Count();
 }
 
+int FindByPs(const std::string &pattern, pid_t *pids, int capacity)
+{
+    Search search(pattern, pids, capacity);
+    const ScratchFile scratch("/tmp/tempTLIBPs" + std::to_string(::getpid()));
+    if (!scratch)
+        return scratch.IsTaken() ? FindInProcessTable(pattern, search) : Fail(ERR_READ_FAILED);
+    if (const auto command = tavo::ShellCommand("/bin/ps -I | /bin/grep '%s' > %s 2>&1", pattern, scratch.Path()))
+        tavo::RunCommandQuietly(*command);
+    const tavo::File found = scratch.Reopen();
+    if (!found)
+        return Fail(ERR_READ_FAILED);
+    AddLines(found.Get(), search);
+    // Most machines' ps does not know -I.
+    return search.HasListed() ? search.Count() : FindInProcessTable(pattern, search);
+}
+
 }  // namespace
 
 extern "C" int TLIBPs(const char *szPattern, pid_t *rgPid, int nPid)
 {
-    if (!szPattern || (!rgPid && nPid > 0))
+    if (!szPattern || ::strnlen(szPattern, kLongestPattern + 1) > kLongestPattern || (!rgPid && nPid > 0))
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] { return FindByPs(szPattern, rgPid, nPid); });
 }
