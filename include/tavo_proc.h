@@ -44,8 +44,11 @@ TAVO_API int TLIBExecv(const char *szProgram, char *const rgszArg[], int fWait);
  * too and ends by SIGABRT at once. -1 with ERR_OP_FAILURE when no process could be started. */
 TAVO_API pid_t TLIBBackgroundExec(const char *szProgram, ...);
 
-/* As TLIBExec, with at most 30 arguments, for at most cSeconds seconds. When they have passed, the program and the
- * process group that it leads get SIGTERM and at once SIGKILL.
+/* As TLIBExec, with at most 30 arguments, for at most cSeconds seconds from the call on. When they have passed, the
+ * program and the process group that it leads get SIGTERM and at once SIGKILL. One that does not die within a second,
+ * because it waits for a disk that does not answer, is left; a later call that starts a program collects it.
+ * The child is a copy of the caller, so that a program that cannot be read from its disk does not hold the caller up: a
+ * caller with much memory pays more for this function than for the others.
  * The first call installs a handler of SIGCHLD, which stays; a process that ignored SIGCHLD before still leaves no
  * zombies. The process is aborted when it has no descriptors left for the pipe that the handler writes to.
  * Returns the status; 255 when szProgram could not be executed; else -1 with
@@ -58,7 +61,8 @@ TAVO_API int TLIBTimedExec(int cSeconds, const char *szProgram, ...);
  * Pid files: the first line holds a process id in decimal. A number outside 1 to the kernel's largest process id, or
  * with anything but blanks around it, is no number. Root opens no symbolic link as a pid file, and for root a file that
  * belongs neither to root nor to the user whose process it names holds no number either: both may have been put there to
- * have root signal a process of somebody's choice.
+ * have root signal a process of somebody's choice. For the same reason a file that its group or others may write to
+ * holds no number.
  */
 
 /* Returns the process id in the pid file szPath; 0 when it holds no number; -1 with
@@ -93,10 +97,11 @@ TAVO_API int BlTLIBProcAlive(pid_t pid);
  * rgPid (not touched when nPid is 0 or less). The caller's own process counts when it matches; the search does not.
  * The source is /bin/ps -I, searched by grep, so szPattern is a basic regular expression there. Where ps does not know
  * -I, the process table is read from /proc ("PID ARGUMENTS", or "PID [NAME]" for a process without arguments) and
- * szPattern is plain text. The scratch file /tmp/tempTLIBPs followed by the caller's pid is removed afterwards.
+ * szPattern is plain text. The scratch file /tmp/tempTLIBPs followed by the caller's pid is removed afterwards; when
+ * somebody else has taken that name, six random characters follow a dot.
  * Returns how many processes match, which may exceed nPid, or -1 with
- *   ERR_BAD_PARAMETERS  szPattern is NULL, or rgPid is NULL with nPid above 0
- *   ERR_READ_FAILED     the scratch file cannot be created (something of another owner is in its place) or opened again
+ *   ERR_BAD_PARAMETERS  szPattern is NULL or longer than 1024 bytes, or rgPid is NULL with nPid above 0
+ *   ERR_READ_FAILED     the scratch file cannot be created or opened again
  *   ERR_OUT_OF_MEMORY
  * Files: /tmp/tempTLIBPs* (created and removed)
  * Runs: /bin/ps, /bin/grep */

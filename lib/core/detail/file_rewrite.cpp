@@ -13,8 +13,6 @@
 namespace tavo {
 namespace {
 
-constexpr mode_t kPermissions = 07777;
-
 // Access lists, security labels and whatever else hangs on the old file. What cannot be copied is left out: not every
 // file system takes them, and the setting is worth more than its label.
 void CopyAttributes(int from, int to) noexcept

@@ -4,7 +4,7 @@
 namespace tavo {
 namespace {
 
-int Open(const char *path, int flags, mode_t mode) noexcept
+int OpenOnce(const char *path, int flags, mode_t mode) noexcept
 {
     for (;;) {
         const int fd = ::open(path, flags | O_CLOEXEC | O_NOCTTY | O_NONBLOCK, mode);
@@ -15,25 +15,32 @@ int Open(const char *path, int flags, mode_t mode) noexcept
 
 }  // namespace
 
+void RestoreMode(int fd, mode_t mode) noexcept
+{
+    const KeepErrno keep;
+    struct stat st;
+    if (::fstat(fd, &st) == 0 && (st.st_mode & kPermissions) != mode)
+        ::fchmod(fd, mode);
+}
+
 Fd OpenFd(const char *path, int flags, mode_t mode) noexcept
 {
     mode &= ~kWritableByOthers;
     if ((flags & O_CREAT) == 0)
-        return Fd(Open(path, flags, mode));
+        return Fd(OpenOnce(path, flags, mode));
     if ((flags & O_EXCL) == 0) {
-        Fd existing(Open(path, flags & ~O_CREAT, mode));
+        Fd existing(OpenOnce(path, flags & ~O_CREAT, mode));
         if (existing || errno != ENOENT)
             return existing;
     }
-    Fd created(Open(path, flags | O_EXCL, mode));
+    Fd created(OpenOnce(path, flags | O_EXCL, mode));
     if (created) {
-        KeepErrno keep;
-        static_cast<void>(::fchmod(created.Get(), mode));  // what a stricter umask took
+        RestoreMode(created.Get(), mode);
         return created;
     }
     if (errno != EEXIST || (flags & O_EXCL) != 0)
         return Fd();
-    return Fd(Open(path, flags, mode));  // another process was faster, or a link leads to a file that is missing
+    return Fd(OpenOnce(path, flags, mode));  // another process was faster, or a link leads to a file that is missing
 }
 
 Fd OpenRegular(const char *path, int flags, mode_t mode) noexcept

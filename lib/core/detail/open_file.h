@@ -15,6 +15,10 @@ namespace tavo {
 // Nothing that the library creates may be written to by group or others. The caller's umask counts for nothing: settings
 // files of the appliance have the same modes whichever program made them.
 constexpr mode_t kWritableByOthers = S_IWGRP | S_IWOTH;
+constexpr mode_t kPermissions = 07777;
+
+// Gives a file that was just created the permissions that a strict umask has taken from it.
+void RestoreMode(int fd, mode_t mode) noexcept;
 
 // open(2) with O_CLOEXEC, O_NOCTTY and O_NONBLOCK added; empty with errno on failure. A file that it creates has exactly
 // the mode, less kWritableByOthers.

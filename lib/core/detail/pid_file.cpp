@@ -44,6 +44,9 @@ std::optional<PidFile> Open(const char *path) noexcept
     struct stat st;
     if (!fd || ::fstat(fd.Get(), &st) != 0)
         return std::nullopt;
+    // What others may write says whatever they like.
+    if ((st.st_mode & kWritableByOthers) != 0)
+        return PidFile{0, st.st_uid};
     char buffer[256];
     return PidFile{ParsePid(ReadStart(fd.Get(), buffer, sizeof buffer), LargestPid()), st.st_uid};
 }

@@ -8,7 +8,8 @@
 
 namespace tavo {
 
-// A file that is to take another one's place. Unless it does, it is removed again.
+// A file that is to take another one's place. Unless it does, it is removed again. While its process lives it is locked
+// (flock); one that is not was left by a process that was killed, and the next rewrite of the same target removes it.
 class TempFile {
   public:
     TempFile() = default;
@@ -16,7 +17,7 @@ class TempFile {
     TempFile(const TempFile &) = delete;
     TempFile &operator=(const TempFile &) = delete;
 
-    // Creates the target's path followed by a dot and six random characters, mode 0600.
+    // Creates the target's path followed by a dot and six characters, mode 0600. Throws bad_alloc.
     bool CreateBeside(const std::string &target);
 
     // Takes over a file that the caller created.
@@ -26,14 +27,15 @@ class TempFile {
     Fd &File() noexcept { return fd_; }
     const std::string &Path() const noexcept { return path_; }
 
-    // Closes; false when the kernel could not take everything.
-    bool Close() noexcept { return fd_.Close(); }
+    // Closes; false when the kernel could not take everything. The lock stays.
+    bool Close() noexcept;
 
     bool RenameTo(const std::string &target) noexcept;
     void Remove() noexcept;
 
   private:
     Fd fd_;
+    Fd lock_;           // holds the lock after Close
     std::string path_;  // empty when there is no file to remove
 };
 

@@ -15,7 +15,7 @@ namespace tavo {
 namespace {
 
 // Names that cannot be guessed need no second try, except on a machine whose random source is not ready.
-constexpr int kTries = 16;
+constexpr int kAsideTries = 16;
 
 // Never replaces another name; kernels and file systems without such a rename replace one that nobody could guess.
 bool RenameAside(const char *from, const char *to) noexcept
@@ -25,7 +25,7 @@ bool RenameAside(const char *from, const char *to) noexcept
     return (errno == ENOSYS || errno == EINVAL) && ::rename(from, to) == 0;
 }
 
-bool IsSame(const struct stat &a, const struct stat &b) noexcept
+bool IsSameFile(const struct stat &a, const struct stat &b) noexcept
 {
     return a.st_dev == b.st_dev && a.st_ino == b.st_ino;
 }
@@ -77,7 +77,7 @@ Fd OpenTrustedRegular(const char *path, int flags, mode_t mode) noexcept
 std::string MoveForeignAside(const std::string &path)
 {
     struct stat seen, moved;
-    for (int tries = 0; tries < kTries; ++tries) {
+    for (int tries = 0; tries < kAsideTries; ++tries) {
         if (::lstat(path.c_str(), &seen) != 0 || IsTrusted(seen))
             return {};
         uint32_t random[2] = {};
@@ -91,7 +91,7 @@ std::string MoveForeignAside(const std::string &path)
                 continue;
             return {};
         }
-        if (::lstat(aside.c_str(), &moved) == 0 && (IsSame(seen, moved) || !IsTrusted(moved)))
+        if (::lstat(aside.c_str(), &moved) == 0 && (IsSameFile(seen, moved) || !IsTrusted(moved)))
             return aside;
         // Another process has put things right in between: that one's goes back.
         RenameAside(aside.c_str(), path.c_str());

@@ -10,7 +10,7 @@
 
 namespace {
 
-// What lies in this directory is copied into every new home, so nothing may stay there.
+// /etc/skel is copied into every new home directory, so the scratch file must not remain.
 constexpr const char *kScratch = "/etc/skel/tempErrTLIBFileComment";
 
 std::optional<std::string> WithComments(std::string_view text, std::string_view key)
@@ -29,20 +29,29 @@ std::optional<std::string> WithComments(std::string_view text, std::string_view 
     return changed;
 }
 
-// Locks the scratch file, which says that its process lives, and sees that it is still the one of that name.
-bool Claim(const tavo::Fd &fd)
+// Marks the scratch file as in use; 0 or errno.
+int Lock(const tavo::Fd &fd)
 {
-    struct stat open_file, named;
-    return ::flock(fd.Get(), LOCK_EX | LOCK_NB) == 0 && ::fstat(fd.Get(), &open_file) == 0 &&
-           ::lstat(kScratch, &named) == 0 && open_file.st_dev == named.st_dev && open_file.st_ino == named.st_ino &&
-           open_file.st_uid == ::geteuid() && open_file.st_nlink == 1;
+    while (::flock(fd.Get(), LOCK_EX | LOCK_NB) != 0) {
+        if (errno != EINTR)
+            return errno;
+    }
+    return 0;
 }
 
-// Removes what a process that died has left. Anything else of that name is not ours and stays.
+// Whether the path still names that file, and nobody else has it.
+bool IsScratch(const tavo::Fd &fd)
+{
+    struct stat open_file, named;
+    return ::fstat(fd.Get(), &open_file) == 0 && ::lstat(kScratch, &named) == 0 && open_file.st_dev == named.st_dev &&
+           open_file.st_ino == named.st_ino && open_file.st_uid == ::geteuid() && open_file.st_nlink == 1;
+}
+
+// Removes the file of a process that died. Anything else of that name is not ours and stays.
 bool RemoveStale()
 {
     const tavo::Fd fd = tavo::OpenRegular(kScratch, O_RDONLY | O_NOFOLLOW);
-    return fd && Claim(fd) && ::unlink(kScratch) == 0;
+    return fd && Lock(fd) == 0 && IsScratch(fd) && ::unlink(kScratch) == 0;
 }
 
 tavo::Fd CreateScratch()
@@ -51,9 +60,15 @@ tavo::Fd CreateScratch()
     tavo::Fd fd = tavo::OpenFd(kScratch, how, 0600);
     if (!fd && errno == EEXIST && RemoveStale())
         fd = tavo::OpenFd(kScratch, how, 0600);
-    if (fd && !Claim(fd))
-        fd.Reset();  // another process took it for stale in that moment, and removes it
-    return fd;
+    if (!fd)
+        return fd;
+    const int error = Lock(fd);
+    if (error == 0 && IsScratch(fd))
+        return fd;
+    // When it is locked already, another process has just found it stale, and removes it.
+    if (error != 0 && error != EWOULDBLOCK && IsScratch(fd))
+        ::unlink(kScratch);
+    return tavo::Fd();
 }
 
 bool OnSameFileSystem(int fd, const std::string &path)

@@ -2,10 +2,7 @@
 #include "tavo_file.h"
 
 #include "core/detail/fault.h"
-#include "core/detail/owner.h"
-
-#include <fcntl.h>
-#include <sys/stat.h>
+#include "core/detail/open_file.h"
 
 extern "C" FILE *TLIBFileTempFileOpen(char *szTemplate)
 {
@@ -14,7 +11,7 @@ extern "C" FILE *TLIBFileTempFileOpen(char *szTemplate)
     tavo::Fd fd(::mkostemp(szTemplate, O_CLOEXEC));
     if (!fd)
         return FailNull(ERR_OPEN_FAILED, Line{45});
-    ::fchmod(fd.Get(), 0600);  // whatever the umask
+    tavo::RestoreMode(fd.Get(), 0600);
     FILE *stream = ::fdopen(fd.Get(), "we");
     if (!stream) {
         ::unlink(szTemplate);

@@ -18,7 +18,7 @@ extern "C" int TAVOProcPidFileCreate(const char *szPath)
             return Fail(ERR_OPEN_FAILED);
         // A pid file that others may write to is not believed.
         if ((st.st_mode & tavo::kWritableByOthers) != 0)
-            ::fchmod(fd.Get(), st.st_mode & 07777 & ~tavo::kWritableByOthers);
+            ::fchmod(fd.Get(), st.st_mode & tavo::kPermissions & ~tavo::kWritableByOthers);
         // Written over the old text and cut afterwards: who reads meanwhile finds a whole first line, old or new.
         const std::string text = std::to_string(::getpid()) + "\n";
         if (!tavo::WriteAll(fd.Get(), text) || ::ftruncate(fd.Get(), static_cast<off_t>(text.size())) != 0 ||

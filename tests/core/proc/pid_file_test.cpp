@@ -152,6 +152,39 @@ TEST(PidFile, ForeignFilesSpeakForTheirOwnersProcesses)
     EXPECT_EQ(::waitpid(victim.Pid(), nullptr, WNOHANG), 0) << "the victim lives";
 }
 
+TEST(PidFile, WhatOthersMayWriteIsNotBelieved)
+{
+    const test::ScratchDir dir;
+    const std::string path = dir / "x.pid";
+    test::WriteFile(path, Number(::getpid()));
+    const struct {
+        mode_t mode;
+        bool believed;
+    } rows[] = {{0644, true}, {0600, true}, {0444, true}, {0664, false}, {0646, false}, {0622, false}, {0666, false}};
+    for (const auto &row : rows) {
+        ASSERT_EQ(::chmod(path.c_str(), row.mode), 0);
+        test::ForgetFault();
+        EXPECT_EQ(TLIBReadPidFile(path.c_str()), row.believed ? ::getpid() : 0) << std::oct << row.mode;
+        EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+        EXPECT_EQ(TLIBProcSignalByPidFile(path.c_str(), 0), row.believed ? 0 : -1) << std::oct << row.mode;
+        EXPECT_EQ(TLIBErrGet(), row.believed ? ERR_SUCCESS : ERR_OPEN_FAILED);
+    }
+    // Under a careless umask, too, and over a file that an earlier release made under one.
+    for (const mode_t mask : {0u, 0777u}) {
+        const mode_t before = ::umask(mask);
+        const int made = TAVOProcPidFileCreate((dir / "new.pid").c_str());
+        ::umask(before);
+        EXPECT_EQ(made, 0);
+        EXPECT_EQ(TLIBReadPidFile((dir / "new.pid").c_str()), ::getpid());
+        struct stat st;
+        ASSERT_EQ(::stat((dir / "new.pid").c_str(), &st), 0);
+        EXPECT_EQ(st.st_mode & 07777, 0644u);
+        ::unlink((dir / "new.pid").c_str());
+    }
+    EXPECT_EQ(TAVOProcPidFileCreate(path.c_str()), 0);
+    EXPECT_EQ(TLIBReadPidFile(path.c_str()), ::getpid());
+}
+
 TEST(PidFile, Create)
 {
     const test::ScratchDir dir;

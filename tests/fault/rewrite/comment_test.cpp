@@ -82,6 +82,19 @@ TEST_F(Comment, FailsWithTheOldTextAndNoScratchFile)
     EXPECT_THAT(log.Texts(), testing::ElementsAre(testing::MatchesRegex("file_comment:[0-9]+ Failed to sync.*")));
 }
 
+// Without the lock the scratch file cannot serve, and the rewrite goes the ordinary way.
+TEST_F(Comment, LeavesNoScratchFileThatCannotBeLocked)
+{
+    for (const int error : {EIO, ENOLCK, ENOSYS}) {
+        Restore();
+        test::FailCalls(Call::flock, error);
+        EXPECT_EQ(TLIBFileComment(kFile, "key"), 1) << error;
+        test::FailCalls(Call::none, 0);
+        EXPECT_EQ(test::ReadFile(kFile), kNewText) << error;
+        EXPECT_TRUE(IsScratchGone()) << error;
+    }
+}
+
 TEST_F(Comment, ADeathAnywhereLeavesOneOfTheTwoFilesAndNothingForNewHomes)
 {
     for (int n = 1;; ++n) {

@@ -2,6 +2,7 @@
 #include "interposed_calls.h"
 
 #include <cerrno>
+#include <csignal>
 #include <cstdio>
 #include <utility>
 
@@ -14,6 +15,7 @@ namespace test {
 namespace {
 
 int die_at;
+int stop_at;
 int calls_made;
 Call failing = Call::none;
 int failing_with;
@@ -22,7 +24,9 @@ char renamed_from[4096];
 
 bool Reached()
 {
-    return ++calls_made == die_at;
+    if (++calls_made == stop_at)
+        ::raise(SIGSTOP);
+    return calls_made == die_at;
 }
 
 // Ends the process or says that the call is to fail.
@@ -45,6 +49,12 @@ bool IsDirectory(int fd)
 void DieAtCall(int n)
 {
     die_at = n;
+    calls_made = 0;
+}
+
+void StopAtCall(int n)
+{
+    stop_at = n;
     calls_made = 0;
 }
 
@@ -114,6 +124,15 @@ int fchmod(int fd, mode_t mode) noexcept
 int fchown(int fd, uid_t owner, gid_t group) noexcept
 {
     return Fails(Call::fchown) ? -1 : ::fchownat(fd, "", owner, group, AT_EMPTY_PATH);
+}
+
+int flock(int fd, int operation) noexcept
+{
+    if (test::failing == Call::flock) {
+        errno = test::failing_with;
+        return -1;
+    }
+    return static_cast<int>(::syscall(SYS_flock, fd, operation));
 }
 
 int rename(const char *from, const char *to) noexcept

@@ -10,10 +10,13 @@ constexpr int kDied = 77;  // the exit status of a process that was ended
 // first half is made. 0: none.
 void DieAtCall(int n);
 
+// The n-th of these calls from now on stops the process (SIGSTOP) before it is made.
+void StopAtCall(int n);
+
 // How many of these calls there were since.
 int CallsMade();
 
-enum class Call { none, fstat, write, fsync_file, fsync_directory, fchmod, fchown, rename };
+enum class Call { none, fstat, write, fsync_file, fsync_directory, fchmod, fchown, rename, flock };
 
 // From now on these calls fail with this errno.
 void FailCalls(Call call, int error);
