@@ -19,7 +19,7 @@ void CutBack(int fd, off_t old_size, size_t appended)
 
 }  // namespace
 
-Fd OpenToAppend(const char *path) noexcept
+Fd OpenToAppend(const char *path)
 {
     return OpenTrustedRegular(path, O_RDWR | O_APPEND);
 }

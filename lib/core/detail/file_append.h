@@ -9,7 +9,7 @@
 namespace tavo {
 
 // Opens a regular file for reading and appending, through the gate of trusted_file.h; empty with errno on failure.
-Fd OpenToAppend(const char *path) noexcept;
+Fd OpenToAppend(const char *path);
 
 // Appends text in one write and syncs it; `fd` is open for reading and appending. A last line that lacks its newline,
 // as a crash may leave it, gets it first. When it fails, the file is cut back to its old length.

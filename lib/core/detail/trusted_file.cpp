@@ -1,13 +1,12 @@
 // The one gate to files in directories in which everybody may create names.
 #include "core/detail/trusted_file.h"
 
+#include "core/detail/file_target.h"
 #include "core/detail/open_file.h"
 
 #include <cerrno>
-#include <climits>
 #include <cstdint>
 #include <cstdio>
-#include <cstring>
 
 #include <sys/random.h>
 
@@ -32,18 +31,10 @@ bool IsSameFile(const struct stat &a, const struct stat &b) noexcept
 
 }  // namespace
 
-bool IsInPublicDirectory(const char *path) noexcept
+bool IsInPublicDirectory(const char *path)
 {
-    char parent[PATH_MAX] = ".";
-    if (const char *const slash = std::strrchr(path, '/')) {
-        const auto length = slash == path ? 1 : static_cast<size_t>(slash - path);
-        if (length >= sizeof parent)
-            return false;  // the kernel opens no such path
-        std::memcpy(parent, path, length);
-        parent[length] = '\0';
-    }
     struct stat st;
-    return ::stat(parent, &st) == 0 && (st.st_mode & S_IWOTH) != 0;
+    return ::stat(DirectoryOf(path).c_str(), &st) == 0 && (st.st_mode & S_IWOTH) != 0;
 }
 
 bool IsTrusted(const struct stat &st) noexcept
@@ -52,12 +43,12 @@ bool IsTrusted(const struct stat &st) noexcept
     return our_owner && (S_ISDIR(st.st_mode) || st.st_nlink == 1);
 }
 
-Fd OpenTrusted(const char *path, int flags, mode_t mode) noexcept
+Fd OpenTrusted(const char *path, int flags, mode_t mode)
 {
     return IsInPublicDirectory(path) ? OpenTrustedRegular(path, flags, mode) : OpenFd(path, flags, mode);
 }
 
-Fd OpenTrustedRegular(const char *path, int flags, mode_t mode) noexcept
+Fd OpenTrustedRegular(const char *path, int flags, mode_t mode)
 {
     if (!IsInPublicDirectory(path))
         return OpenRegular(path, flags, mode);
