@@ -7,7 +7,9 @@
 
 namespace tavo {
 
-FolderReader::FolderReader(const char *path) noexcept : FolderReader(OpenFd(path, O_RDONLY | O_DIRECTORY)) {}
+FolderReader::FolderReader(const char *path) noexcept : FolderReader(OpenFd(path, O_RDONLY | O_DIRECTORY))
+{
+}
 
 FolderReader::FolderReader(Fd folder) noexcept
 {

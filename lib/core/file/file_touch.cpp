@@ -8,7 +8,5 @@ extern "C" int TLIBFileTouch(const char *szPath)
 {
     if (!szPath)
         return Fail(ERR_BAD_PARAMETERS);
-    return Guard([&] {
-        return tavo::OpenTrustedRegular(szPath, O_RDONLY | O_CREAT) ? 0 : Fail(ERR_OPEN_FAILED);
-    });
+    return Guard([&] { return tavo::OpenTrustedRegular(szPath, O_RDONLY | O_CREAT) ? 0 : Fail(ERR_OPEN_FAILED); });
 }

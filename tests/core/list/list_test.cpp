@@ -192,15 +192,42 @@ TEST(List, ABlockWithoutASizeIsRefused)
         const char *name;
         std::function<bool()> refused;
     } rows[] = {
-        {"push", [&] { return TLIBSzListPush(&broken, text.c_str()) == -1; }},
-        {"insert", [&] { return TLIBSzListInsert(&broken, 0, text.c_str()) == -1; }},
-        {"unshift", [&] { return TLIBSzListUnshift(&broken, text.c_str()) == -1; }},
-        {"set", [&] { return TLIBSzListSet(&broken, 0, text.c_str()) == -1; }},
-        {"expand", [&] { return PslTLIBISzListExpand(broken) == nullptr; }},
-        {"union", [&] { return PslTLIBSzListOr(&broken, whole, 0) == nullptr; }},
-        {"union with it", [&] { return PslTLIBSzListOr(&whole, broken, TLIB_SZLIST_NEW) == nullptr; }},
-        {"intersection", [&] { return PslTLIBSzListAnd(broken, whole, TLIB_SZLIST_NEW) == nullptr; }},
-        {"difference", [&] { return PslTLIBSzListSub(broken, whole, TLIB_SZLIST_NEW) == nullptr; }},
+        {"push",
+         [&] {
+             return TLIBSzListPush(&broken, text.c_str()) == -1;
+         }},
+        {"insert",
+         [&] {
+             return TLIBSzListInsert(&broken, 0, text.c_str()) == -1;
+         }},
+        {"unshift",
+         [&] {
+             return TLIBSzListUnshift(&broken, text.c_str()) == -1;
+         }},
+        {"set",
+         [&] {
+             return TLIBSzListSet(&broken, 0, text.c_str()) == -1;
+         }},
+        {"expand",
+         [&] {
+             return PslTLIBISzListExpand(broken) == nullptr;
+         }},
+        {"union",
+         [&] {
+             return PslTLIBSzListOr(&broken, whole, 0) == nullptr;
+         }},
+        {"union with it",
+         [&] {
+             return PslTLIBSzListOr(&whole, broken, TLIB_SZLIST_NEW) == nullptr;
+         }},
+        {"intersection",
+         [&] {
+             return PslTLIBSzListAnd(broken, whole, TLIB_SZLIST_NEW) == nullptr;
+         }},
+        {"difference",
+         [&] {
+             return PslTLIBSzListSub(broken, whole, TLIB_SZLIST_NEW) == nullptr;
+         }},
     };
     const int32_t size = broken->nSize, free = broken->nFree;
     for (const int32_t wrong : {0, 23, -1, INT_MIN}) {
