@@ -232,7 +232,7 @@ TAVO_API int TAVOServiceOnOffALL(int fOn);
 
 /* Runs the start-up scripts of installed packages (/usr/tavo/etc/rc.d/packages, in the order of their names, backwards
  * for "stop") with the argument "start", "stop" or "restart". Returns the number of scripts that succeeded, or -1 with
- * ERR_BAD_PARAMETERS.
+ * ERR_BAD_PARAMETERS, or with ERR_READ_FAILED and no script run when the folder of packages cannot be read.
  * Files: /usr/tavo/etc/rc.d/packages (read)
  * Runs: /usr/tavo/etc/rc.d/packages */
 TAVO_API int TAVOServiceThirdPartyAll(const char *szAction);
@@ -244,7 +244,7 @@ TAVO_API int TAVOServiceThirdPartyAll(const char *szAction);
 
 /* Chooses the volume of data folder idShare: the one that its link names when that is mounted and the folder exists,
  * else the mounted and writable one with the most free space. Its path goes to szVolume. Returns its number, 0 with ERR_NO_SERVICE_VOLUME,
- * -1 with ERR_BAD_PARAMETERS. */
+ * -1 with ERR_BAD_PARAMETERS, or with ERR_UNKNOWN when the link cannot be read. */
 TAVO_API int TAVOServiceNewVolumeDecide(int idShare, char *szVolume, int cbVolume);
 
 /* Binds data folder idShare to volume szVolume: creates the share, then sets the link. A volume that is not mounted is

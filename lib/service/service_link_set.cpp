@@ -5,6 +5,8 @@
 #include "core/detail/log.h"
 
 #include <cerrno>
+#include <climits>
+#include <cstdio>
 
 #include <sys/stat.h>
 #include <unistd.h>
@@ -28,13 +30,24 @@ bool MakeLinkFolder()
     return (::unlink(kLinkFolder) == 0 || errno == ENOENT) && ::mkdir(kLinkFolder, 0777) == 0;
 }
 
-// Only a link is taken away: a folder or a file in its place is somebody's data.
-bool RemoveLink(const char *path)
+// Only a link is replaced: a folder or a file in its place is somebody's data. The old link stays until the new one is
+// there.
+bool ReplaceLink(const char *target, const char *path)
 {
     struct stat st;
     if (::lstat(path, &st) != 0)
-        return errno == ENOENT;
-    return S_ISLNK(st.st_mode) && ::unlink(path) == 0;
+        return errno == ENOENT && ::symlink(target, path) == 0;
+    if (!S_ISLNK(st.st_mode))
+        return false;
+    char next[PATH_MAX];
+    std::snprintf(next, sizeof next, "%s.%d", path, ::getpid());
+    ::unlink(next);  // of a process of that number that died here
+    if (::symlink(target, next) != 0)
+        return false;
+    if (::rename(next, path) == 0)
+        return true;
+    ::unlink(next);
+    return false;
 }
 
 }  // namespace
@@ -54,7 +67,7 @@ extern "C" int TAVOServiceLinkSet(int idShare, const char *szTarget)
         LogError("%s(%d)Failed to mkdir : %s", kLinkFolder);
         return Fail(code);
     }
-    if (!RemoveLink(share.szLink) || ::symlink(szTarget, share.szLink) != 0) {
+    if (!ReplaceLink(szTarget, share.szLink)) {
         LogError("%s(%d)Failed to create link of %s for share=%s", szTarget, share.szShare);
         return Fail(ERR_MKDIR_FAILED);
     }

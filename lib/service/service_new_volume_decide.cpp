@@ -21,13 +21,14 @@ unsigned long long FreeBytes(const tavo::Volume &volume)
     return static_cast<unsigned long long>(space.f_bavail) * space.f_frsize;
 }
 
-// The mounted volume that holds the service's data; 0 when its folder is gone. A folder that is found where the volume is
-// not mounted is on the system's own disk.
+// The mounted volume that holds the service's data; 0 when its folder is gone, -1 when its link cannot be read. A folder
+// that is found where the volume is not mounted is on the system's own disk.
 int OldVolume(int idShare, const std::vector<tavo::Volume> &mounted)
 {
     TAVOSERVICESHARE share;
-    if (TAVOServiceSettingGet(idShare, &share) != 1)
-        return 0;
+    const int found = TAVOServiceSettingGet(idShare, &share);
+    if (found != 1)
+        return found;
     const int number = tavo::VolumeNumber(tavo::VolumeOf(share.szVolume));
     return std::any_of(mounted.begin(), mounted.end(),
                        [&](const tavo::Volume &volume) { return volume.number == number; })
@@ -58,6 +59,8 @@ extern "C" int TAVOServiceNewVolumeDecide(int idShare, char *szVolume, int cbVol
     return Guard([&] {
         const std::vector<tavo::Volume> mounted = tavo::MountedVolumes();
         int number = OldVolume(idShare, mounted);
+        if (number < 0)
+            return -1;  // another volume would be chosen although the data is there
         if (number == 0)
             number = RoomiestVolume(mounted);
         if (number == 0)

@@ -2,6 +2,7 @@
 #include "tavo_service.h"
 
 #include "core/detail/guard.h"
+#include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
 #include "service/detail/service_table.h"
 #include "service/detail/settings_files.h"
@@ -37,6 +38,7 @@ extern "C" int TAVOServiceSettingGet(int idShare, TAVOSERVICESHARE *pShare)
     share.fOnVolume = result == 1;
     if (share.szVolumePath[0]) {
         TLIBErrSet(ERR_SUCCESS);
+        const tavo::KeepFault keep;  // a volume of unknown type is logged, and not a failure
         const int type = Guard([&] { return tavo::VolumeType(share.szVolumePath); });
         if (type < 0) {
             const int code = TLIBErrGet() ? TLIBErrGet() : ERR_NO_VOLUME_ID;

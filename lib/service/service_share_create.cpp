@@ -35,7 +35,7 @@ extern "C" int TAVOServiceShareCreate(int idShare, const char *szVolume)
     return Guard([&] {
         if (!MakeFolders(path))
             return Fail(errno == ENOSPC ? ERR_NOT_ENOUGH_SPACE : ERR_MKDIR_FAILED);
-        TAVOServiceSettingGet(idShare, &share);
+        tavo::FindDataFolder(idShare, share);
         if (const int code = tavo::RecordShare(share.szShareName, path))
             return Fail(code);
         return 0;

@@ -2,6 +2,7 @@
 #include "tavo_service.h"
 
 #include "core/detail/fault.h"
+#include "service/detail/data_folder.h"
 #include "service/detail/volume_list.h"
 
 #include <cstdio>
@@ -12,7 +13,7 @@ extern "C" int TAVOServiceShareGen(int idShare, const char *szVolume, char *szPa
 
     if (!szVolume || !tavo::VolumeNumber(szVolume) || !szPath || cbPath <= 0)
         return Fail(ERR_BAD_PARAMETERS);
-    if (TAVOServiceSettingGet(idShare, &share) < 0 && TLIBErrGet() == ERR_BAD_PARAMETERS)
+    if (!tavo::FindDataFolder(idShare, share))
         return -1;
     const int length = std::snprintf(nullptr, 0, "%s/%s", szVolume, share.szShareName);
     if (length >= cbPath)

@@ -1,34 +1,18 @@
-// Tells whether the data folder of a service holds anything.
+// Whether the data folder of a service holds anything.
 #include "tavo_service.h"
 
 #include "core/detail/fault.h"
+#include "core/detail/folder_reader.h"
 #include "service/detail/service_table.h"
-
-#include <memory>
-#include <string_view>
-
-#include <dirent.h>
-
-namespace {
-
-struct CloseFolder {
-    void operator()(DIR *folder) const { ::closedir(folder); }
-};
-
-}  // namespace
 
 extern "C" int TAVOServiceShareIsEmpty(int idShare)
 {
     const tavo::ServiceShareRow *row = tavo::FindServiceShare(idShare);
     if (!row)
         return Fail(ERR_BAD_PARAMETERS);
-    const std::unique_ptr<DIR, CloseFolder> folder(::opendir(row->share.szLink));
-    if (!folder)
-        return Fail(ERR_MAKE_PATH);
-    while (const dirent *entry = ::readdir(folder.get())) {
-        const std::string_view name = entry->d_name;
-        if (name != "." && name != "..")
-            return 0;
-    }
-    return 1;
+    tavo::FolderReader folder(row->share.szLink);
+    if (folder.Next())
+        return 0;
+    // Callers delete what is empty, so a folder that cannot be read must not pass for one.
+    return folder.Failed() ? Fail(ERR_MAKE_PATH) : 1;
 }

@@ -30,12 +30,14 @@ extern "C" int TAVOServiceShareRemove(int idShare, int fDelete)
 
     if (!tavo::FindServiceShare(idShare))
         return Fail(ERR_BAD_PARAMETERS);
-    TAVOServiceSettingGet(idShare, &share);
+    tavo::FindDataFolder(idShare, share);
     return Guard([&] {
         std::string path;
+        if (const int code = tavo::SharePath(share.szShareName, path))
+            return Fail(code);
         // A record that points outside the volumes was not made here, and nothing is deleted for it.
-        if (fDelete && tavo::SharePath(share.szShareName, path) == 0 && !tavo::VolumeOf(path).empty() &&
-            path.find("/../") == std::string::npos && path.ends_with(share.szShareName) && IsBehindNoLink(path)) {
+        if (fDelete && !tavo::VolumeOf(path).empty() && path.find("/../") == std::string::npos &&
+            path.ends_with(share.szShareName) && IsBehindNoLink(path)) {
             std::error_code failed;
             std::filesystem::remove_all(path, failed);  // deletes links, never follows them
             if (failed)

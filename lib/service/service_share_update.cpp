@@ -2,6 +2,7 @@
 #include "tavo_service.h"
 
 #include "core/detail/guard.h"
+#include "service/detail/data_folder.h"
 #include "service/detail/share_file.h"
 
 #include <climits>
@@ -14,7 +15,7 @@ extern "C" int TAVOServiceShareUpdate(int idShare, const char *szVolume)
 
     if (TAVOServiceShareGen(idShare, szVolume, path, sizeof path) < 0)
         return -1;
-    TAVOServiceSettingGet(idShare, &share);
+    tavo::FindDataFolder(idShare, share);
     return Guard([&] {
         std::string recorded;
         if (const int code = tavo::SharePath(share.szShareName, recorded))

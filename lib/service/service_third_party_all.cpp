@@ -3,11 +3,12 @@
 
 #include "tavo_proc.h"
 
+#include "core/detail/folder_reader.h"
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
 
 #include <algorithm>
-#include <filesystem>
+#include <cerrno>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -18,17 +19,17 @@ namespace {
 
 constexpr const char *kPackages = "/usr/tavo/etc/rc.d/packages";
 
-std::vector<std::string> Scripts()
+// Whether the folder was read to its end; an appliance without packages has none.
+bool FindScripts(std::vector<std::string> &scripts)
 {
-    std::vector<std::string> scripts;
-    std::error_code failed;
-    for (const auto &entry : std::filesystem::directory_iterator(kPackages, failed)) {
-        const std::string path = entry.path();
+    tavo::FolderReader folder(kPackages);
+    while (const char *const name = folder.Next()) {
+        const std::string path = std::string(kPackages) + "/" + name;
         if (path.ends_with(".sh") && ::access(path.c_str(), X_OK) == 0)
             scripts.push_back(path);
     }
     std::sort(scripts.begin(), scripts.end());
-    return scripts;
+    return !folder.Failed() || errno == ENOENT;
 }
 
 }  // namespace
@@ -39,7 +40,11 @@ extern "C" int TAVOServiceThirdPartyAll(const char *szAction)
     if (action != "start" && action != "stop" && action != "restart")
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        std::vector<std::string> scripts = Scripts();
+        std::vector<std::string> scripts;
+        if (!FindScripts(scripts)) {
+            LogError("%s:%d Failed to read %s, errno=%d", kPackages, errno);
+            return Fail(ERR_READ_FAILED);
+        }
         if (action == "stop")
             std::reverse(scripts.begin(), scripts.end());
         int done = 0;

@@ -26,15 +26,19 @@ uint32_t Word(const char *page, size_t at)
     return word;
 }
 
-bool IsWholeBtree(int fd, off_t size)
+// What cannot be read may well be a store: it must not be removed as one that is not.
+BtreeFile LookAtContent(int fd, off_t size)
 {
     char page[kHeader];
-    if (::pread(fd, page, sizeof page, 0) != static_cast<ssize_t>(sizeof page))
-        return false;
-    const uint32_t page_size = Word(page, kPageSizeAt);
-    return Word(page, kMagicAt) == BTREEMAGIC && static_cast<uint8_t>(page[kTypeAt]) == kBtreeMetaType &&
-           std::has_single_bit(page_size) && page_size >= 512 && page_size <= 65536 &&
-           size >= (off_t{Word(page, kLastPageAt)} + 1) * page_size;
+    const ssize_t got = ::pread(fd, page, sizeof page, 0);
+    if (got < 0)
+        return BtreeFile::unreadable;
+    const uint32_t page_size = got == static_cast<ssize_t>(sizeof page) ? Word(page, kPageSizeAt) : 0;
+    const bool whole = page_size != 0 && Word(page, kMagicAt) == BTREEMAGIC &&
+                       static_cast<uint8_t>(page[kTypeAt]) == kBtreeMetaType && std::has_single_bit(page_size) &&
+                       page_size >= 512 && page_size <= 65536 &&
+                       size >= (off_t{Word(page, kLastPageAt)} + 1) * page_size;
+    return whole ? BtreeFile::store : BtreeFile::foreign;
 }
 
 // A directory of our own that goes away with what the database left in it.
@@ -88,8 +92,10 @@ BtreeFile LookAtBtreeFile(const char *path, const StoreAccess &access, StoreFile
     const Fd fd = OpenFd(path, O_RDONLY | O_NOFOLLOW);
     if (!fd || ::fstat(fd.Get(), &st) != 0)
         return BtreeFile::unreadable;
-    if (!S_ISREG(st.st_mode) || (access.is_ours && !IsOurs(st, access.mode)) || !IsWholeBtree(fd.Get(), st.st_size))
+    if (!S_ISREG(st.st_mode) || (access.is_ours && !IsOurs(st, access.mode)))
         return BtreeFile::foreign;
+    if (const BtreeFile content = LookAtContent(fd.Get(), st.st_size); content != BtreeFile::store)
+        return content;
     // Not when it has that mode already: setting it would change the time stamp by which the seal knows the file.
     if (access.mode != 0 && ::geteuid() == 0 && (st.st_mode & 07777) != access.mode)
         ::fchmod(fd.Get(), access.mode);

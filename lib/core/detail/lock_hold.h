@@ -8,6 +8,7 @@
 
 #include "tavo_lock.h"
 
+#include "core/detail/keep_fault.h"
 #include "core/detail/owner.h"
 
 namespace tavo {
@@ -28,7 +29,8 @@ class LockHold {
     {
         if (!std::exchange(held_, false))
             return;
-        KeepErrno keep;
+        const KeepErrno keep;
+        const KeepFault keep_fault;  // closing the file releases the lock all the same
         ErrTLIBFileUnlock(request_);
     }
 

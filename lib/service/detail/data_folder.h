@@ -3,9 +3,25 @@
 #ifndef TAVO_SERVICE_DETAIL_DATA_FOLDER_H
 #define TAVO_SERVICE_DETAIL_DATA_FOLDER_H
 
+#include "tavo_service.h"
+
+#include "core/detail/keep_fault.h"
+#include "service/detail/service_table.h"
+
 #include <sys/stat.h>
 
 namespace tavo {
+
+// The record of a data folder for those who need its name: a link that cannot be read does not matter to them. False for a
+// bad id, which has been recorded.
+inline bool FindDataFolder(int idShare, TAVOSERVICESHARE &share)
+{
+    if (!FindServiceShare(idShare))
+        return TAVOServiceSettingGet(idShare, &share) >= 0;
+    const KeepFault keep;
+    TAVOServiceSettingGet(idShare, &share);
+    return true;
+}
 
 inline bool IsRealFolder(const char *path) noexcept
 {

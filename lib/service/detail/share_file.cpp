@@ -9,6 +9,10 @@
 #include "core/detail/list_owner.h"
 #include "core/detail/lock_hold.h"
 
+#include <cerrno>
+
+#include <unistd.h>
+
 namespace tavo {
 namespace {
 
@@ -22,7 +26,11 @@ int ReadShare(const char *name, HashOwner &share)
     share.Reset(PshTLIBSzHashAlloc(kHashBytes));
     if (!share)
         return ERR_OUT_OF_MEMORY;
-    return TLIBFileGetSection(kShares, name, share.Addr()) < 0 ? TLIBErrGet() : 0;
+    const KeepFault keep;  // the caller reports the code
+    if (TLIBFileGetSection(kShares, name, share.Addr()) >= 0)
+        return 0;
+    const int code = TLIBErrGet();
+    return ::access(kShares, F_OK) != 0 && errno == ENOENT ? 0 : code;  // nothing has been recorded yet
 }
 
 }  // namespace
@@ -63,8 +71,8 @@ int ForgetShare(const char *name)
     std::string path;
     if (!lock)
         return TLIBErrGet();
-    if (SharePath(name, path) != 0 || path.empty())
-        return 0;
+    if (const int code = SharePath(name, path); code != 0 || path.empty())
+        return code;
     return ErrTLIBFileRemoveSection(kShares, name) < 0 ? TLIBErrGet() : 0;
 }
 
