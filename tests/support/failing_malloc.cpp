@@ -3,7 +3,11 @@
 
 #include <cerrno>
 #include <cstddef>
+#include <cstring>
 #include <new>
+
+#include <dlfcn.h>
+#include <execinfo.h>
 
 #ifdef TEST_WITH_ASAN
 #define REAL(name) __interceptor_##name
@@ -26,6 +30,9 @@ struct Armed {
     int until_failure = 0;
     bool fired = false;
     int live = 0;
+    bool keeps_stack = false;
+    int frames = 0;
+    void *stack[64] = {};
 };
 
 constinit thread_local Armed armed;
@@ -37,6 +44,12 @@ bool Fails()
         return false;
     if (--armed.until_failure == 0) {
         armed.fired = true;
+        if (armed.keeps_stack) {
+            const bool on = armed.on;
+            armed.on = false;
+            armed.frames = ::backtrace(armed.stack, 64);
+            armed.on = on;
+        }
         errno = ENOMEM;
         return true;
     }
@@ -61,7 +74,7 @@ bool EachAllocation::Next()
 
 void EachAllocation::Arm()
 {
-    armed = {true, round_, false, 0};
+    armed = {.on = true, .until_failure = round_};
 }
 
 void EachAllocation::Disarm()
@@ -79,7 +92,19 @@ void EachAllocation::Disarm()
 
 void StartCounting()
 {
-    armed = {true, 0, false, 0};
+    void *warm[4];
+    ::backtrace(warm, 4);  // allocates the first time
+    armed = {.on = true, .keeps_stack = true};
+}
+
+bool FailedInside(const char *object)
+{
+    for (int i = 0; i < armed.frames; ++i) {
+        Dl_info info;
+        if (::dladdr(armed.stack[i], &info) && info.dli_fname && std::strstr(info.dli_fname, object))
+            return true;
+    }
+    return false;
 }
 
 void FailAllocation(int n)

@@ -47,6 +47,7 @@ void StartCounting();
 void FailAllocation(int n);
 void StopFailing();
 bool AllocationFailed();
+bool FailedInside(const char *object);  // whether a library of that name was on the stack of the one that failed
 int StopCounting();  // blocks allocated since StartCounting less blocks freed
 
 }  // namespace test

@@ -167,6 +167,16 @@ pid_t StartStopped(const std::function<void()> &work)
     __builtin_unreachable();
 }
 
+std::vector<uintptr_t> StackOf(pid_t child, uintptr_t top)
+{
+    std::vector<uintptr_t> words(4096);
+    iovec here = {words.data(), words.size() * sizeof(uintptr_t)};
+    iovec there = {reinterpret_cast<void *>(top), here.iov_len};
+    const ssize_t got = ::process_vm_readv(child, &here, 1, &there, 1, 0);
+    words.resize(got > 0 ? static_cast<size_t>(got) / sizeof(uintptr_t) : 0);
+    return words;
+}
+
 // Runs the work and asks at each system call what becomes of it; once something has become of one, the rest goes on unseen.
 Ending RunTraced(const std::function<void()> &work, int seconds,
                  const std::function<Verdict(const SystemCall &)> &judge)
@@ -210,7 +220,9 @@ Ending RunTraced(const std::function<void()> &work, int seconds,
             ::kill(child, SIGKILL);
         } else if (verdict.what == Verdict::fail) {
             ending.reached = true;
-            if (SkipCall(child))
+            ending.stack = StackOf(child, static_cast<uintptr_t>(info.stack_pointer));
+            // A close that fails has closed all the same.
+            if (call.number == SYS_close || SkipCall(child))
                 failing = verdict.error;
         }
     }
@@ -274,6 +286,7 @@ bool CanFail(const SystemCall &call)
 #endif
     case SYS_umask:
     case SYS_sync:
+    case SYS_wait4:         // of a child that is there
     case SYS_rt_sigaction:  // of valid arguments, which the C library passes
     case SYS_rt_sigprocmask:
         return false;

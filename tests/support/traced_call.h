@@ -35,6 +35,7 @@ struct Ending {
     bool reached = false;  // the child made that many system calls
     bool hung = false;     // it did not end within the time limit, and was killed
     int status = 0;        // as waitpid gives it
+    std::vector<uintptr_t> stack = {};  // words of it when the call was failed: who made it
 
     bool IsClean() const { return !hung && status == 0; }
 };
@@ -52,7 +53,8 @@ void MarkCalls();
 std::vector<SystemCall> DistinctCalls(const std::vector<SystemCall> &calls);
 bool CanFail(const SystemCall &call);
 
-// The Nth system call is not made and gives -1 with `error`. Everything after it is as usual.
+// The Nth system call is not made and gives -1 with `error`; only close is made, as a kernel does that reports an error of
+// what was written before. Everything after it is as usual.
 Ending FailsAtCall(int n, int error, const std::function<void()> &work, int seconds = 20);
 
 // The child is killed before it makes its Nth system call. False when it came to its end before that.

@@ -1,0 +1,86 @@
+// One call of every exported function: how a call is watched and what it came to.
+#include "call.h"
+
+#include "support/failing_malloc.h"
+#include "support/traced_call.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+
+namespace every_call {
+
+Trial::Trial(Report &report, Watch watch, int failing_allocation)
+    : report_(report), watch_(watch), failing_allocation_(failing_allocation)
+{
+    if (watch_ == Watch::allocations)
+        test::StartCounting();
+}
+
+Trial::~Trial()
+{
+    if (watch_ == Watch::allocations)
+        report_.live = test::StopCounting();
+    report_.done = true;
+}
+
+void Trial::Begin()
+{
+    TLIBErrSet(ERR_SUCCESS);
+    if (watch_ == Watch::allocations)
+        test::FailAllocation(failing_allocation_);
+    else if (watch_ == Watch::system_calls)
+        test::MarkCalls();
+}
+
+void Trial::End()
+{
+    if (watch_ == Watch::allocations) {
+        test::StopFailing();
+        report_.fired = test::AllocationFailed();
+        report_.database = test::FailedInside("libdb");
+    } else if (watch_ == Watch::system_calls) {
+        test::MarkCalls();
+    }
+    report_.code = TLIBErrGet();
+}
+
+void Trial::Show(std::string_view text)
+{
+    const size_t length = std::min(text.size(), sizeof report_.text - used_ - 2);
+    std::memcpy(report_.text + used_, text.data(), length);
+    used_ += length;
+    report_.text[used_++] = ' ';
+    report_.text[used_] = 0;
+}
+
+void Trial::Show(long long number)
+{
+    char text[24];
+    std::snprintf(text, sizeof text, "%lld", number);
+    Show(std::string_view(text));
+}
+
+void Trial::Show(const TLIBSZLIST *list)
+{
+    for (int i = 0; list && i < list->nItem; ++i)
+        Show(std::string_view(list->pszItem[i]));
+}
+
+void Trial::Show(const TLIBSZHASH *hash)
+{
+    for (int slot = 0; hash && slot < hash->nSlot; ++slot) {
+        if (hash->slots[slot].pszKey) {
+            Show(std::string_view(hash->slots[slot].pszKey));
+            Show(std::string_view(hash->slots[slot].pszValue));
+        }
+    }
+}
+
+bool WasFailed(long result)
+{
+    return result == -1 && (errno == EIO || errno == ENOSPC || errno == EACCES || errno == EMFILE || errno == EINTR);
+}
+
+}  // namespace every_call

@@ -1,0 +1,396 @@
+// Every exported function is called once; then each of its system calls fails, with each of the errors that a worn disk, a
+// full one, a stranger's file, a busy process and a signal bring; then each of its allocations. Whatever fails, the
+// process lives, no file is half written, and the caller is told the truth.
+#include "call.h"
+
+#include "support/appliance_root.h"
+#include "support/captured_log.h"
+#include "support/descriptors.h"
+#include "support/failing_malloc.h"
+#include "support/file_snapshot.h"
+#include "support/rounds.h"
+#include "support/traced_call.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <csignal>
+#include <cstring>
+#include <fstream>
+#include <iterator>
+#include <map>
+#include <set>
+
+#include <fcntl.h>
+#include <sys/mman.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+using every_call::Call;
+using every_call::Family;
+using every_call::Report;
+using every_call::Trial;
+using test::KeptFile;
+using test::KeptFiles;
+
+namespace every_call {
+void LoadAnswers();
+}
+
+namespace {
+
+Report *dying_report = nullptr;
+
+constexpr int kErrors[] = {EIO, ENOSPC, EACCES, EMFILE, EINTR};
+
+constexpr size_t kMany = 25;  // places in one call
+
+constexpr const char *kExported =
+#include "exported_names.h"
+    ;
+
+std::vector<Family> Families()
+{
+    return {every_call::CoreFamily(), every_call::StorageFamily(), every_call::AccountFamily(),
+            every_call::NetworkFamily(), every_call::ServiceFamily()};
+}
+
+// The names of a version script: what stands alone on a line and ends in a semicolon.
+std::set<std::string> ExportedNames()
+{
+    std::set<std::string> names;
+    const std::string text = kExported;
+    for (size_t at = 0; at < text.size();) {
+        const size_t end = text.find('\n', at);
+        const std::string line = text.substr(at, end - at);
+        const size_t first = line.find_first_not_of(' ');
+        if (line.ends_with(';') && first != line.npos && line[first] != '*' && line[first] != '}')
+            names.insert(line.substr(first, line.size() - first - 1));
+        at = end + 1;
+    }
+    return names;
+}
+
+TEST(EveryCall, EveryExportedNameIsInTheTable)
+{
+    std::set<std::string> called;
+    for (const Family &family : Families()) {
+        for (const Call &call : family.calls)
+            called.insert(call.name);
+    }
+    const std::set<std::string> exported = ExportedNames();
+    ASSERT_GT(exported.size(), 400u);
+    for (const std::string &name : exported)
+        EXPECT_TRUE(called.contains(name)) << name << " is exported and in no table of calls";
+    for (const std::string &name : called)
+        EXPECT_TRUE(exported.contains(name)) << name << " is in a table of calls and not exported";
+}
+
+// What may come and go with any call: locks, the caches that are made again from the files, and the journals from which the
+// next program finishes a change.
+bool IsPassing(const std::string &path)
+{
+    for (const std::string_view place : {"/tmp/lock", "/tmp/.db.", "/etc/.tavouser.commit", "/etc/.tavogroup.commit",
+                                         "/etc/network.undo", "/etc/.pwd.lock"}) {
+        if (path.starts_with(place))
+            return true;
+    }
+    return false;
+}
+
+std::string NameOf(const testing::TestParamInfo<Family> &family)
+{
+    return family.param.name;
+}
+
+class EveryCall : public testing::TestWithParam<Family> {
+  protected:
+    void SetUp() override
+    {
+        if (test::RootForm().empty())
+            GTEST_SKIP() << "only in an appliance root";
+        every_call::LoadAnswers();
+        kept_ = GetParam().prepare();
+        if (testing::Test::IsSkipped() || testing::Test::HasFatalFailure())
+            return;
+        void *const shared = ::mmap(nullptr, sizeof(Report), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
+        ASSERT_NE(shared, MAP_FAILED);
+        report_ = static_cast<Report *>(shared);
+    }
+
+    void TearDown() override
+    {
+        if (report_)
+            ::munmap(report_, sizeof *report_);
+    }
+
+    // TAVO_CALL=NAME in the environment of the program looks at one function alone.
+    static bool IsChosen(const Call &call)
+    {
+        const char *const chosen = std::getenv("TAVO_CALL");
+        return !chosen || std::string_view(chosen) == call.name;
+    }
+
+    static bool IsOnStack(const std::vector<uintptr_t> &stack, std::string_view object)
+    {
+        std::ifstream maps("/proc/self/maps");
+        for (std::string line; std::getline(maps, line);) {
+            unsigned long begin = 0;
+            unsigned long end = 0;
+            char modes[8] = "";
+            if (line.find(object) == line.npos || std::sscanf(line.c_str(), "%lx-%lx %7s", &begin, &end, modes) != 3 ||
+                modes[2] != 'x')
+                continue;
+            if (std::any_of(stack.begin(), stack.end(), [&](uintptr_t word) { return word >= begin && word < end; }))
+                return true;
+        }
+        return false;
+    }
+
+    static void Silence()
+    {
+        const int nowhere = ::open("/dev/null", O_RDWR);
+        ::dup2(nowhere, STDOUT_FILENO);
+        ::dup2(nowhere, STDERR_FILENO);
+        ::close(nowhere);
+    }
+
+    // The body of a child: makes the call and counts what it leaves open.
+    void Make(const Call &call, Trial::Watch watch, int failing_allocation = 0)
+    {
+        Silence();
+        {
+            Trial run(*report_, watch, failing_allocation);
+            if (call.flags & every_call::kZeroFails)
+                run.ZeroFails();
+            call.body(run);
+        }
+        report_->descriptors = test::OpenDescriptors();
+    }
+
+    // In a child that nobody traces.
+    Report MakeInChild(const Call &call, Trial::Watch watch, int failing_allocation, int &status)
+    {
+        *report_ = {};
+        const pid_t child = ::fork();
+        if (child == 0) {
+            ::alarm(30);
+            dying_report = report_;
+            ::signal(SIGSEGV, [](int signal) {
+                dying_report->database = test::FailedInside("libdb");
+                ::signal(signal, SIG_DFL);
+                ::raise(signal);
+            });
+            Make(call, watch, failing_allocation);
+            ::syscall(SYS_exit_group, 0);
+        }
+        ::waitpid(child, &status, 0);
+        return *report_;
+    }
+
+    // Compares what a call came to while something failed with what it comes to when nothing does.
+    static void Judge(const Call &call, const Report &clean, const Report &got)
+    {
+        const bool same = std::strcmp(clean.text, got.text) == 0;
+        if (got.failed && !clean.failed) {
+            EXPECT_TRUE(got.code != ERR_SUCCESS || (call.flags & every_call::kNoCode)) << "a failure without a code";
+        } else if (!(call.flags & every_call::kAnswers)) {
+            EXPECT_TRUE(same) << "\"" << got.text << "\" instead of \"" << clean.text << "\", code " << std::hex
+                              << got.code;
+            EXPECT_TRUE(got.code == clean.code || (call.flags & every_call::kLeavesCode))
+                << "a success that leaves code " << std::hex << got.code;
+        }
+    }
+
+    // A text without what differs each time that it is written: the salts and dates of passwords.
+    static std::string Comparable(const std::string &path, const std::string &content)
+    {
+        if (!path.ends_with("/shadow") && !path.ends_with("/smbpasswd"))
+            return content;
+        std::string names;
+        for (size_t at = 0; at < content.size();) {
+            const size_t end = std::min(content.find('\n', at), content.size());
+            names += content.substr(at, std::min(content.find(':', at), end) - at) + "\n";
+            at = end + 1;
+        }
+        return names;
+    }
+
+    static bool IsIn(const KeptFiles &files, const std::string &path, const KeptFile &file)
+    {
+        const auto found = files.find(path);
+        return found != files.end() && (found->second.facts.st_mode & S_IFMT) == (file.facts.st_mode & S_IFMT) &&
+               Comparable(path, found->second.content) == Comparable(path, file.content);
+    }
+
+    // Files are as they were or as they become, and nothing else has come into being.
+    static void JudgeFiles(const Call &call, const KeptFiles &before, const KeptFiles &after, const KeptFiles &found,
+                           bool may_leave)
+    {
+        if (call.flags & every_call::kSteps)
+            return;
+        for (const auto &[path, file] : found) {
+            if (IsPassing(path))
+                continue;
+            // What a journal that is left names is moved into place by the next program.
+            if (path.ends_with(".tmp") && found.contains("/etc/.tavouser.commit"))
+                continue;
+            if (!before.contains(path) && !after.contains(path)) {
+                EXPECT_TRUE(may_leave) << path << " is left";
+                continue;
+            }
+            const bool created = (call.flags & every_call::kCreates) && !before.contains(path) && file.content.empty();
+            EXPECT_TRUE(created || IsIn(before, path, file) || IsIn(after, path, file)) << path << " is half written:\n"
+                                                                                        << file.content.substr(0, 2000);
+        }
+        for (const auto &[path, file] : before) {
+            EXPECT_TRUE(IsPassing(path) || !after.contains(path) || found.contains(path)) << path << " is gone";
+        }
+    }
+
+    std::shared_ptr<void> kept_;
+    Report *report_ = nullptr;
+};
+
+// In this process: what a checker of memory sees.
+TEST_P(EveryCall, Once)
+{
+    test::FileSnapshot files(GetParam().folders);
+    for (const Call &call : GetParam().calls) {
+        SCOPED_TRACE(call.name);
+        int status = 0;
+        if (call.flags & every_call::kInChild) {
+            MakeInChild(call, Trial::Watch::nothing, 0, status);
+            EXPECT_EQ(status, 0);
+        } else {
+            *report_ = {};
+            Trial run(*report_, Trial::Watch::nothing, 0);
+            if (call.flags & every_call::kZeroFails)
+                run.ZeroFails();
+            call.body(run);
+        }
+        EXPECT_TRUE(!report_->failed || (call.flags & every_call::kAnswers))
+            << report_->text << ", code " << std::hex << report_->code << " from "
+            << (TAVOErrorGetFile() ? TAVOErrorGetFile() : "");
+        files.Restore();
+    }
+}
+
+TEST_P(EveryCall, EachSystemCallFails)
+{
+    if (!test::CanTrace())
+        GTEST_SKIP() << "ptrace is refused here";
+    test::FileSnapshot files(GetParam().folders);
+    const KeptFiles before = files.Files();
+    const int open = test::OpenDescriptors();
+    int tried = 0;
+    for (const Call &call : GetParam().calls) {
+        if ((call.flags & every_call::kNoFaults) || !IsChosen(call))
+            continue;
+        const std::function<void()> work = [&] {
+            Make(call, Trial::Watch::system_calls);
+        };
+        // Once for what is made on first use, such as the account stores; then what there is to fail.
+        for (int round = 0; round < 2; ++round) {
+            *report_ = {};
+            test::SystemCallsOf(work);
+            files.Restore();
+        }
+        *report_ = {};
+        const auto calls = test::SystemCallsOf(work);
+        const Report clean = *report_;
+        EXPECT_TRUE(clean.done) << call.name;
+        const KeptFiles after = files.Now();
+        files.Restore();
+        const auto chosen = std::getenv("TAVO_LONG_TESTS") ? calls : test::DistinctCalls(calls);
+        for (size_t i = 0; i < chosen.size(); i += static_cast<size_t>(test::Stride())) {
+            if (!test::CanFail(chosen[i]))
+                continue;
+            for (size_t e = 0; e < std::size(kErrors); ++e) {
+                if (chosen.size() > kMany && !std::getenv("TAVO_LONG_TESTS") && e != i % std::size(kErrors))
+                    continue;  // of so many places each fails with one of the errors in turn
+                const int error = kErrors[e];
+                SCOPED_TRACE(std::string(call.name) + ": system call " + std::to_string(chosen[i].index) + " of " +
+                             std::to_string(calls.back().index) + ", " + chosen[i].Name() + ", fails with " +
+                             ::strerrorname_np(error));
+                *report_ = {};
+                const test::Ending ending = test::FailsAtCall(chosen[i].index, error, work);
+                const Report got = *report_;
+                ++tried;
+                const bool database = IsOnStack(ending.stack, "libdb");
+                if (database && (ending.IsClean() || WIFSIGNALED(ending.status))) {
+                    // Berkeley DB loses descriptors, memory and itself when the system fails it.
+                    files.Restore();
+                    continue;
+                }
+                if ((call.flags & every_call::kMayAbort) && WIFSIGNALED(ending.status) &&
+                    WTERMSIG(ending.status) == SIGABRT)
+                    continue;
+                EXPECT_TRUE(ending.IsClean()) << ending;
+                if (ending.IsClean()) {
+                    Judge(call, clean, got);
+                    const std::string name = chosen[i].Name();
+                    const bool closes = name == "close";
+                    EXPECT_TRUE(closes || (call.flags & every_call::kHolds) ||
+                                got.descriptors <= std::max(open, clean.descriptors))
+                        << "a descriptor is left open";
+                    JudgeFiles(call, before, after, files.Now(), name.starts_with("unlink") || name == "rmdir");
+                }
+                files.Restore();
+            }
+        }
+    }
+    EXPECT_GT(tried, 0);
+    RecordProperty("tried", tried);
+}
+
+TEST_P(EveryCall, EachAllocationFails)
+{
+    test::FileSnapshot files(GetParam().folders);
+    const KeptFiles before = files.Files();
+    for (const Call &call : GetParam().calls) {
+        if ((call.flags & every_call::kNoFaults) || !IsChosen(call))
+            continue;
+        int status = 0;
+        if (!(call.flags & every_call::kInChild)) {
+            // What the process keeps for itself is allocated here, not in each child.
+            *report_ = {};
+            {
+                Trial run(*report_, Trial::Watch::nothing, 0);
+                call.body(run);
+            }
+            files.Restore();
+        }
+        const Report clean = MakeInChild(call, Trial::Watch::allocations, 0, status);
+        const KeptFiles after = files.Now();
+        files.Restore();
+        EXPECT_EQ(status, 0) << call.name;
+        EXPECT_TRUE(clean.live <= 0 || (call.flags & every_call::kHolds)) << call.name << " leaves memory allocated";
+        bool fired = true;
+        for (int n = 1; fired; n += test::Stride()) {
+            SCOPED_TRACE(std::string(call.name) + ": allocation " + std::to_string(n));
+            const Report got = MakeInChild(call, Trial::Watch::allocations, n, status);
+            fired = got.fired;
+            if (got.database && WIFSIGNALED(status)) {
+                fired = true;
+                files.Restore();
+                continue;
+            }
+            EXPECT_EQ(status, 0);
+            if (status != 0)
+                break;
+            Judge(call, clean, got);
+            if (!got.database) {
+                EXPECT_LE(got.live, std::max(clean.live, 0)) << "memory is left allocated";
+                EXPECT_LE(got.descriptors, clean.descriptors) << "a descriptor is left open";
+            }
+            JudgeFiles(call, before, after, files.Now(), false);
+            files.Restore();
+        }
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(Of, EveryCall, testing::ValuesIn(Families()), NameOf);
+
+}  // namespace
