@@ -48,7 +48,7 @@ void FailAllocation(int n);
 void StopFailing();
 bool AllocationFailed();
 bool FailedInside(const char *object);  // whether a library of that name was on the stack of the one that failed
-int StopCounting();  // blocks allocated since StartCounting less blocks freed
+int StopCounting();                     // blocks allocated since StartCounting less blocks freed
 
 }  // namespace test
 

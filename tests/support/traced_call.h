@@ -32,9 +32,9 @@ struct SystemCall {
 
 // How the child ended.
 struct Ending {
-    bool reached = false;  // the child made that many system calls
-    bool hung = false;     // it did not end within the time limit, and was killed
-    int status = 0;        // as waitpid gives it
+    bool reached = false;               // the child made that many system calls
+    bool hung = false;                  // it did not end within the time limit, and was killed
+    int status = 0;                     // as waitpid gives it
     std::vector<uintptr_t> stack = {};  // words of it when the call was failed: who made it
 
     bool IsClean() const { return !hung && status == 0; }
