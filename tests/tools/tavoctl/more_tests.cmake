@@ -4,3 +4,8 @@ target_link_libraries(tools_tavoctl_test PRIVATE crypt)
 add_test(NAME tavoctl_texts COMMAND ${folder}/texts $<TARGET_PROPERTY:tavoctl_man_page,MAN_PAGE>
     ${PROJECT_SOURCE_DIR} ${CMAKE_CROSSCOMPILING_EMULATOR} $<TARGET_FILE:tavoctl>)
 set_tests_properties(tavoctl_texts PROPERTIES TIMEOUT 120)
+
+# What the verbs print as JSON, against the schemas that are installed, by a validator that is not tavoctl's own.
+add_test(NAME tavoctl_schemas COMMAND ${folder}/schemas $<TARGET_PROPERTY:tavoctl_schemas,FOLDER_OF_SCHEMAS>
+    ${TAVO_ENTER} ${TAVO_ENTER_OPTIONS} --)
+set_tests_properties(tavoctl_schemas PROPERTIES TIMEOUT 300)

@@ -141,9 +141,14 @@ TEST_F(TavoctlService, DryRunShowsFoldersAndBindsNothing)
     ASSERT_EQ(::mkdir("/volume2/video", 0755), 0);
     const test::Ran ran = Tavoctl({"service", "enable", "--dry-run", "--json", "media"});
     EXPECT_EQ(ran.status, 0);
-    EXPECT_EQ(test::Facts(ran), (json{{{"service", "media"}, {"folder", "/volume2/music"}, {"there", false}},
-                                      {{"service", "media"}, {"folder", "/volume2/video"}, {"there", true}},
-                                      {{"service", "media"}, {"folder", "/volume2/photo"}, {"there", false}}}));
+    std::vector<std::string> changes;
+    const json facts = test::Facts(ran);
+    for (const json &change : facts.at("changes"))
+        changes.push_back(change.at("object").get<std::string>() + " " + change.at("column").get<std::string>() + " " +
+                          change.at("old").dump());
+    EXPECT_THAT(changes, testing::ElementsAre("service media enabled false", "service media running false",
+                                              "service media bound false", "/volume2/music folder false",
+                                              "/volume2/photo folder false"));
     EXPECT_FALSE(std::filesystem::exists("/volume2/music"));
     EXPECT_EQ(LinkTarget("/var/services/video"), "");
     EXPECT_EQ(Row("media").at("enabled"), false);
@@ -199,7 +204,14 @@ TEST_F(TavoctlService, VolumeBindsTheFoldersAndRestoreFindsThemAgain)
 {
     ASSERT_EQ(Tavoctl({"service", "enable", "--wait", "30", "web"}).status, 0);
     EXPECT_EQ(test::Facts({"service", "volume", "--dry-run", "--json", "web", "1"}),
-              (json{{{"link", "/var/services/web"}, {"from", "/volume2/web"}, {"to", "/volume1/web"}}}));
+              (json{{"changed", true},
+                    {"dry_run", true},
+                    {"changes",
+                     {{{"object", "/var/services/web"},
+                       {"column", "target"},
+                       {"old", "/volume2/web"},
+                       {"new", "/volume1/web"}}}}}));
+    EXPECT_EQ(test::Facts({"service", "enable", "--json", "web"}).at("changed"), false) << "it is enabled and runs";
     EXPECT_EQ(LinkTarget("/var/services/web"), "/volume2/web");
     EXPECT_EQ(Tavoctl({"service", "volume", "web", "1"}).status, 0);
     EXPECT_EQ(LinkTarget("/var/services/web"), "/volume1/web");

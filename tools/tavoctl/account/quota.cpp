@@ -87,7 +87,7 @@ Action QuotaSwitch(Arguments &in, bool on)
         if (on)
             progress.Show("counting what users have on " + mounted.path);
         const int result = on ? TAVOQuotaInit(mounted.number) : TAVOQuotaOff(mounted.number);
-        Must(result == 0, attempted, TLIBErrGet() == ERR_QUOTA_CHECK ? "stop what writes to the volume" : "");
+        Must(result == 0, attempted, HintFor{ERR_QUOTA_CHECK, "stop what writes to the volume"});
     };
 }
 

@@ -75,14 +75,8 @@ namespace {
 ArgumentText TextOf(const std::string &name, const std::string &value, const std::string &help,
                     const ArgumentKind &kind, bool required, bool many = false, Words choices = {})
 {
-    return {name, value, help, name[0] != '-', required, many, kind, std::move(choices)};
-}
-
-ArgumentKind KindWith(Candidates candidates)
-{
-    ArgumentKind kind = any_text;
-    kind.candidates = candidates;
-    return kind;
+    const std::string sample = choices.empty() ? kind.sample : choices[0];
+    return {name, value, help, name[0] != '-', required, many, kind, std::move(choices), sample};
 }
 
 int64_t ParseNumber(const std::string &name, const std::string &word, int64_t least, int64_t most)
@@ -158,10 +152,10 @@ Given<std::optional<int64_t>> Arguments::Number(const char *name, const char *va
     Given<std::optional<int64_t>> given;
     ArgumentKind kind = any_text;
     kind.name = "number";
-    kind.sample = "7";
     kind.wrong = "many";
-    parts_->Add(TextOf(name, value_name, help, kind, name[0] != '-'),
-                [=](const Words &words) { given.Set(ParseNumber(name, words[0], least, most)); });
+    ArgumentText text = TextOf(name, value_name, help, kind, name[0] != '-');
+    text.sample = std::to_string(least);
+    parts_->Add(std::move(text), [=](const Words &words) { given.Set(ParseNumber(name, words[0], least, most)); });
     return given;
 }
 
@@ -181,63 +175,6 @@ Given<Words> Arguments::Program()
     parts_->app.prefix_command();
     parts_->texts.push_back(TextOf("PROGRAM", "PROGRAM", "the program, then its arguments", any_text, true, true));
     return given;
-}
-
-void Arguments::Text(const std::string &name, std::string &value, const std::string &help, Candidates candidates)
-{
-    parts_->Add(TextOf(name, name, help, KindWith(candidates), true), [&](const Words &words) { value = words[0]; });
-}
-
-void Arguments::OptionalText(const std::string &name, std::string &value, const std::string &help,
-                             Candidates candidates)
-{
-    parts_->Add(TextOf(name, name, help, KindWith(candidates), false), [&](const Words &words) { value = words[0]; });
-}
-
-void Arguments::Texts(const std::string &name, Words &values, const std::string &help, int at_least,
-                      Candidates candidates)
-{
-    parts_
-        ->Add(TextOf(name, name, help, KindWith(candidates), at_least > 0, true),
-              [&](const Words &words) { values = words; })
-        ->expected(at_least, CLI::detail::expected_max_vector_size)
-        ->allow_extra_args();
-}
-
-void Arguments::Option(const std::string &name, const std::string &value_name, std::string &value,
-                       const std::string &help, Candidates candidates)
-{
-    parts_->Add(TextOf(name, value_name, help, KindWith(candidates), false),
-                [&](const Words &words) { value = words[0]; });
-}
-
-void Arguments::Option(const std::string &name, const std::string &value_name, std::optional<std::string> &value,
-                       const std::string &help, Candidates candidates)
-{
-    parts_->Add(TextOf(name, value_name, help, KindWith(candidates), false),
-                [&](const Words &words) { value = words[0]; });
-}
-
-void Arguments::Number(const std::string &name, const std::string &value_name, int &value, const std::string &help,
-                       int least, int most)
-{
-    parts_->Add(TextOf(name, value_name, help, any_text, name[0] != '-'), [=, &value](const Words &words) {
-        value = static_cast<int>(ParseNumber(name, words[0], least, most));
-    });
-}
-
-void Arguments::Flag(const std::string &name, bool &value, const std::string &help)
-{
-    parts_->Add(TextOf(name, "", help, any_text, false), [&](const Words &) { value = true; });
-}
-
-void Arguments::Program(Words &words)
-{
-    parts_->program = [&](Words given) {
-        words = std::move(given);
-    };
-    parts_->app.prefix_command();
-    parts_->texts.push_back(TextOf("PROGRAM", "PROGRAM", "the program, then its arguments", any_text, true, true));
 }
 
 bool Arguments::Parse(Words words)

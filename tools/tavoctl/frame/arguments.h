@@ -25,6 +25,7 @@ struct ArgumentText {
     bool many;
     ArgumentKind kind;
     std::vector<std::string> choices;  // when nothing else is allowed
+    std::string sample;                // a valid one
 };
 
 // The value of an argument, once the command line was read.
@@ -74,21 +75,6 @@ class Arguments {
     const std::vector<ArgumentText> &Texts() const;
     std::string Usage() const;  // "tavoctl conf set [OPTION]... KEY VALUE"
     std::string Help() const;   // the options and arguments, described
-
-    // For verbs that are classes.
-    void Text(const std::string &name, std::string &value, const std::string &help, Candidates candidates = nullptr);
-    void OptionalText(const std::string &name, std::string &value, const std::string &help,
-                      Candidates candidates = nullptr);
-    void Texts(const std::string &name, Words &values, const std::string &help, int at_least = 1,
-               Candidates candidates = nullptr);
-    void Option(const std::string &name, const std::string &value_name, std::string &value, const std::string &help,
-                Candidates candidates = nullptr);
-    void Option(const std::string &name, const std::string &value_name, std::optional<std::string> &value,
-                const std::string &help, Candidates candidates = nullptr);
-    void Number(const std::string &name, const std::string &value_name, int &value, const std::string &help,
-                int least = 0, int most = std::numeric_limits<int>::max());
-    void Flag(const std::string &name, bool &value, const std::string &help);
-    void Program(Words &words);
 
   private:
     struct Parts;

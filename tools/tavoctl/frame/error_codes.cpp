@@ -22,7 +22,7 @@ constexpr ErrorCode codes[] = {
     ROW(ERR_SUCCESS,                 "no failure", ""),
     ROW(ERR_NOT_ENOUGH_MEMORY,       "the caller's buffer is too small; nothing was written to it", ""),
     ROW(ERR_OUT_OF_MEMORY,           "an allocation failed; nothing was changed", "free memory and try again"),
-    ROW(ERR_ACCESS_DENIED,           "no permission", "become root"),
+    ROW(ERR_ACCESS_DENIED,           "no permission", "run it as root"),
     ROW(ERR_LOCK_FAILED,             "a lock could not be had in time", "another program holds it; try again, or wait longer with --timeout"),
     ROW(ERR_UNLOCK_FAILED,           "a lock could not be released", ""),
     ROW(ERR_PATH_NOT_FOUND,          "a directory on the way is missing", "check the path"),

@@ -2,6 +2,7 @@
 #include "frame/failure.h"
 
 #include "frame/error_codes.h"
+#include "frame/table.h"
 #include "frame/terminal_text.h"
 
 #include "tavo_error.h"
@@ -98,7 +99,7 @@ std::string Failure::Json() const
     if (const std::string advice = Hint(); !advice.empty())
         error["hint"] = advice;
     error["status"] = Status();
-    const nlohmann::ordered_json whole = {{"error", error}};
+    const nlohmann::ordered_json whole = {{"format_version", format_version}, {"error", error}};
     return whole.dump(-1, ' ', true, nlohmann::ordered_json::error_handler_t::replace);
 }
 
@@ -119,6 +120,11 @@ void Must(bool condition, const std::string &attempted, const std::string &hint)
 {
     if (!condition)
         throw LibraryFailure(attempted, hint);
+}
+
+void Must(bool condition, const std::string &attempted, const HintFor &hint)
+{
+    Must(condition, attempted, std::string(condition || TLIBErrGet() != hint.code ? hint.otherwise : hint.hint));
 }
 
 Failure SystemFailure(std::string attempted, int error)

@@ -34,6 +34,14 @@ inline constexpr char log_hint[] = "look at the system log";
 // Throws the library's failure unless the condition, the success of a call, holds.
 void Must(bool condition, const std::string &attempted, const std::string &hint = {});
 
+// The hint for one code of the library, and for the others.
+struct HintFor {
+    int code;
+    const char *hint;
+    const char *otherwise = "";
+};
+void Must(bool condition, const std::string &attempted, const HintFor &hint);
+
 // A failed system call, by its errno.
 Failure SystemFailure(std::string attempted, int error);
 

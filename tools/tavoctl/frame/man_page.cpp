@@ -1,7 +1,10 @@
 // The man page, written from what the verbs declare.
+#include "frame/failure.h"
 #include "frame/program.h"
 
 #include <cctype>
+#include <cerrno>
+#include <fstream>
 #include <string_view>
 
 namespace tavoctl {
@@ -124,6 +127,16 @@ std::string ManPage(const Family &family)
     for (const VerbEntry &entry : family.Verbs())
         page += VerbText(family, entry);
     return page + ".SH SEE ALSO\n.BR tavoctl (1)\n";
+}
+
+void WriteManPages(const Program &program, const std::string &folder)
+{
+    for (const auto &family : program.Families()) {
+        const std::string path = folder + "/tavoctl-" + family->Name() + ".1";
+        std::ofstream file(path);
+        if (!(file << ManPage(*family)).flush())
+            throw SystemFailure("write " + path, errno);
+    }
 }
 
 }  // namespace tavoctl

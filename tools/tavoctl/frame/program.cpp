@@ -128,7 +128,7 @@ ReadyVerb::ReadyVerb(const Family &family, const VerbEntry &entry)
     : arguments_(family.Command(entry)), action_(entry.declare(arguments_))
 {
     const unsigned traits = entry.traits;
-    if ((traits & tells_before) || (entry.ReportsChanges() && !(traits & runs_program)))
+    if (entry.ReportsChanges())
         dry_run_ = arguments_.Flag("--dry-run", "change nothing and show what would change");
     if (traits & destroys)
         yes_ = arguments_.Flag("--yes", "do it without asking");
@@ -212,8 +212,8 @@ int Program::Run(std::vector<std::string> words) const
 bool Program::RunForTools(const std::vector<std::string> &words) const
 {
     const std::string first = words.empty() ? "" : words[0];
-    if (first == "--man-page" && words.size() > 1 && Find(words[1]))
-        std::cout << ManPage(*Find(words[1]));
+    if (first == "--man-pages" && words.size() == 2)
+        WriteManPages(*this, words[1]);
     else if (first == "--man-page")
         std::cout << ManPage(*this);
     else if (first == "--registry")

@@ -17,7 +17,7 @@ struct VerbEntry {
     Answer answer;
     std::string purpose;
     std::string examples;  // a command a line
-    std::function<Action(Arguments &)> declare;
+    Action (*declare)(Arguments &);
 
     std::string Summary() const;  // the first sentence, without its full stop
     bool ReportsChanges() const { return answer.form == Answer::change; }
@@ -29,24 +29,6 @@ class Family {
 
     // The text is what the verb does, an empty line, and examples, a command a line.
     void Add(const char *name, unsigned traits, Answer answer, std::string_view text, Action (*declare)(Arguments &));
-
-    // NewVerb is a Verb with a static constexpr VerbInfo named info.
-    template <class NewVerb>
-    void Add()
-    {
-        verbs_.push_back({NewVerb::info.name,
-                          NewVerb::info.traits,
-                          {},
-                          NewVerb::info.purpose,
-                          NewVerb::info.examples,
-                          [](Arguments &in) -> Action {
-                              const auto verb = std::make_shared<NewVerb>();
-                              verb->Declare(in);
-                              return [verb](Call &call) {
-                                  call.status = verb->Run(call);
-                              };
-                          }});
-    }
 
     const char *Name() const { return name_; }
     const char *Purpose() const { return purpose_; }
@@ -105,6 +87,8 @@ std::string VerbHelp(const Family &family, const VerbEntry &entry);
 // The man page, in man(7) macros: of the program, or of one family.
 std::string ManPage(const Program &program);
 std::string ManPage(const Family &family);
+// The pages of all families into a folder, tavoctl-conf.1 and so on.
+void WriteManPages(const Program &program, const std::string &folder);
 
 // What may stand in the place of the last word, one candidate each.
 std::vector<std::string> Complete(const Program &program, std::vector<std::string> words);

@@ -88,16 +88,10 @@ Json ListOf(const std::vector<ColumnFacts> &columns, Details details = Details::
 
 Json ChangeSchema()
 {
-    constexpr ColumnFacts columns[] = {
-        {"object", "what is changed", Kind::text, false, in_list, ""},
-        {"column", "which of its facts", Kind::text, false, in_list, ""},
-        {"old", "null where there was none", Kind::any, true, in_list, ""},
-        {"new", "null where there is none any more", Kind::any, true, in_list, ""},
-    };
     Json properties = Version();
     properties["changed"] = {{"type", "boolean"}};
-    properties["changes"] = {
-        {"type", "array"}, {"items", ObjectOf({std::begin(columns), std::end(columns)}, Details::all, Json::object())}};
+    properties["changes"] = {{"type", "array"},
+                             {"items", ObjectOf(Facts(change_columns), Details::all, Json::object())}};
     Json schema = ObjectOf({}, Details::all, std::move(properties));
     schema["properties"]["dry_run"] = {{"const", true}};
     schema["properties"]["diff"] = {{"type", "string"}, {"description", "of the file that the verb edits"}};
@@ -150,11 +144,9 @@ std::string TraitNames(unsigned traits)
 
 Json ArgumentJson(const ArgumentText &text)
 {
-    Json argument = {{"name", text.name},          {"value", text.value},    {"help", text.help},
-                     {"required", text.required},  {"many", text.many},      {"kind", text.kind.name},
-                     {"sample", text.kind.sample}, {"choices", text.choices}};
-    if (!text.choices.empty())
-        argument["sample"] = text.choices[0];
+    Json argument = {{"name", text.name},         {"value", text.value},    {"help", text.help},
+                     {"required", text.required}, {"many", text.many},      {"kind", text.kind.name},
+                     {"sample", text.sample},     {"choices", text.choices}};
     argument["wrong"] = text.kind.wrong ? Json(text.kind.wrong) : text.choices.empty() ? Json() : Json("nonsense");
     return argument;
 }
@@ -203,7 +195,7 @@ void WriteSchemas(const Program &program, const std::string &folder)
     write("error", SchemaOf(nullptr, nullptr));
     for (const auto &family : program.Families())
         for (const VerbEntry &entry : family->Verbs())
-            if (entry.answer.form != Answer::other && entry.answer.form != Answer::nothing)
+            if (entry.answer.form != Answer::nothing)
                 write(family->Name() + std::string(entry.name.empty() ? "" : "-") + entry.name,
                       SchemaOf(family.get(), &entry));
 }

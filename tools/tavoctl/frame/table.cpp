@@ -184,12 +184,6 @@ std::string Cell::Csv() const
     return quoted + "\"";
 }
 
-Table::Table(const std::vector<std::string> &names) : names_(names)
-{
-    for (const std::string &name : names_)
-        columns_.push_back({name.c_str(), "", Kind::any, true, in_list, ""});
-}
-
 void Table::Add(std::vector<Cell> row, int parent)
 {
     rows_.push_back({std::move(row), parent});
@@ -296,7 +290,7 @@ std::string ChangeReport::Text() const
 {
     if (!diff.empty() || changes.empty())
         return diff;
-    Table table(std::vector<std::string>{"object", "column", "old", "new"});
+    Table table(Facts(change_columns));
     for (const Change &change : changes)
         table.Add({change.object, change.column, change.before, change.after});
     return table.Text();

@@ -5,7 +5,6 @@
 
 #include "frame/column.h"
 
-#include <initializer_list>
 #include <string>
 #include <utility>
 #include <vector>
@@ -22,12 +21,6 @@ struct TableStyle {
 class Table {
   public:
     explicit Table(std::vector<ColumnFacts> columns) : columns_(std::move(columns)) {}
-    explicit Table(const std::vector<std::string> &names);
-    explicit Table(std::initializer_list<const char *> names)
-        : Table(std::vector<std::string>(names.begin(), names.end()))
-    {
-    }
-
     // A row below another one in a tree, by the index of that one.
     void Add(std::vector<Cell> row, int parent = -1);
     bool Empty() const { return rows_.empty(); }
@@ -41,7 +34,6 @@ class Table {
         std::vector<Cell> cells;
         int parent;
     };
-    std::vector<std::string> names_;  // of columns without facts of their own
     std::vector<ColumnFacts> columns_;
     std::vector<Row> rows_;
 };
@@ -73,6 +65,13 @@ struct Change {
     Cell after;
 };
 
+inline constexpr Column<Change> change_columns[] = {
+    {"object", field<&Change::object>, "what is changed"},
+    {"column", field<&Change::column>, "which of its facts"},
+    {"old", field<&Change::before>, "null where there was none"},
+    {"new", field<&Change::after>, "null where there is none any more"},
+};
+
 struct ChangeReport {
     std::vector<Change> changes;
     std::vector<std::pair<std::string, Cell>> chosen;  // ids and the like
@@ -83,11 +82,6 @@ struct ChangeReport {
     std::string Text() const;
     std::string Json() const;
 };
-
-inline Cell Known(const std::string &text)
-{
-    return Maybe(text);
-}
 
 }  // namespace tavoctl
 

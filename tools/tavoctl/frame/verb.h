@@ -35,7 +35,6 @@ namespace tavoctl {
 enum Trait : unsigned {
     reads = 0,
     changes = 1,        // root only; --force-host: refused where the machine is not an appliance; --dry-run
-    tells_before = 2,   // --dry-run, for verbs that are classes
     destroys = 4,       // --yes: asks first
     by_anybody = 8,     // changes only what its caller may change anyway
     runs_program = 16,  // its answer is that of a program of the caller's
@@ -43,7 +42,7 @@ enum Trait : unsigned {
 
 // What a verb prints as JSON.
 struct Answer {
-    enum Form { nothing, one, list, document, change, other } form = other;
+    enum Form { nothing, one, list, document, change } form = nothing;
     std::vector<ColumnFacts> columns = {};
     std::vector<ColumnFacts> or_one = {};  // a list verb that can also show one thing
 
@@ -147,26 +146,6 @@ struct Call {
 
 // Throws a Failure.
 using Action = std::function<void(Call &)>;
-
-// A verb that is a class.
-class Verb {
-  public:
-    Verb() = default;
-    virtual ~Verb() = default;
-    Verb(const Verb &) = delete;
-    Verb &operator=(const Verb &) = delete;
-
-    virtual void Declare(Arguments &) {}
-    // Returns the exit status; throws a Failure. It is silent where it has only succeeded.
-    virtual int Run(const Call &call) = 0;
-};
-
-struct VerbInfo {
-    const char *name;  // "" for a family that is one command
-    unsigned traits;
-    const char *purpose;   // a sentence or more, without a line feed at the end
-    const char *examples;  // a command a line
-};
 
 }  // namespace tavoctl
 

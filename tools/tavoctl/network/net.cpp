@@ -2,13 +2,12 @@
 #include "families.h"
 #include "frame/containers.h"
 #include "frame/failure.h"
-#include "frame/table.h"
+#include "frame/program.h"
 #include "network/net_verbs.h"
 
 #include "tavo_net.h"
 
 #include <algorithm>
-#include <charconv>
 #include <filesystem>
 
 namespace tavoctl {
@@ -26,222 +25,280 @@ std::vector<std::string> InterfaceNames()
     return names;
 }
 
+const ArgumentKind interface_kind = {
+    .name = "interface",
+    .allowed = "1 to 15 letters, digits, \".\", \"-\", \"_\" and \":\"",
+    .valid =
+        [](const std::string &name) {
+            return !name.empty() && name.size() < sizeof TAVONETCARD::szInterface && name[0] != '.' &&
+                   std::all_of(name.begin(), name.end(), [](unsigned char c) {
+                       return std::isalnum(c) || c == '.' || c == '-' || c == '_' || c == ':';
+                   });
+        },
+    .candidates = InterfaceNames,
+    .sample = "eth77",
+    .wrong = "../eth0",
+};
+
 namespace {
 
-std::vector<std::string> Ipv6Addresses(const char *interface)
+struct NetFacts {
+    TAVONETCARD card;
+    std::optional<std::string> hostname, live_gateway;
+    std::vector<std::string> dns;
+    std::vector<std::string> ipv6_addresses;
+    std::optional<bool> wake_on_lan;
+};
+
+constexpr Column<NetFacts> net_columns[] = {
+    {"hostname", field<&NetFacts::hostname>},
+    {"interface",
+     [](const NetFacts &n) {
+         return std::string(n.card.szInterface);
+     }},
+    {"mode", [](const NetFacts &n) -> std::string { return n.card.nMode == TAVO_NET_DHCP ? "dhcp" : "static"; },
+     "dhcp or static"},
+    {"address",
+     [](const NetFacts &n) {
+         return Maybe(n.card.szIp);
+     }},
+    {"mask",
+     [](const NetFacts &n) {
+         return Maybe(n.card.szMask);
+     }},
+    {"network",
+     [](const NetFacts &n) {
+         return Maybe(n.card.szNetwork);
+     }},
+    {"broadcast",
+     [](const NetFacts &n) {
+         return Maybe(n.card.szBroadcast);
+     }},
+    {"gateway", [](const NetFacts &n) { return Maybe(n.card.szGateway); }, "as it is stored"},
+    {"live_gateway", field<&NetFacts::live_gateway>, "as it is used"},
+    {"dns", field<&NetFacts::dns>, "the name servers"},
+    {"mac",
+     [](const NetFacts &n) {
+         return Maybe(n.card.szMac);
+     }},
+    {"mtu", [](const NetFacts &n) { return n.card.nMtu; }, "", in_list, "bytes"},
+    {"link",
+     [](const NetFacts &n) {
+         return n.card.fLink != 0;
+     }},
+    {"ipv6",
+     [](const NetFacts &n) {
+         return BlTAVONetIPv6IsEnabled(n.card.szInterface) == 1;
+     }},
+    {"ipv6_addresses", field<&NetFacts::ipv6_addresses>},
+    {"wake_on_lan", field<&NetFacts::wake_on_lan>},
+};
+
+struct AddressUse {
+    std::string address, interface;
+    bool used;
+};
+
+constexpr Column<AddressUse> address_columns[] = {
+    {"address", field<&AddressUse::address>},
+    {"interface", field<&AddressUse::interface>, "that would have the address"},
+    {"used", field<&AddressUse::used>, "by another host"},
+};
+
+Cell PresentHostname()
 {
-    StringList list;
-    return TAVONetIPv6AddrEnum(interface, list.Address()) < 0 ? std::vector<std::string>() : list.Items();
+    char name[64] = "";
+    return TAVOLnxGetHostname(name, sizeof name) == 0 ? Cell(name) : Cell();
 }
 
-class NetShow : public Verb {
-  public:
-    static constexpr VerbInfo info = {
-        "show", reads,
-        "Shows the first wired interface, the gateway as it is stored and as it is used, the name servers and the host "
-        "name.",
-        "tavoctl net show\n"
-        "tavoctl net show --json"};
+std::vector<std::string> PresentServers()
+{
+    StringList servers;
+    TAVONetDNSGet(servers.Address());
+    return servers.Items();
+}
 
-    int Run(const Call &call) override
-    {
-        const TAVONETCARD card = FirstCard("show the network");
+std::optional<std::string> PresentGateway()
+{
+    char gateway[20] = "";
+    return TAVONetDefaultGatewayGet(gateway, sizeof gateway) == 0 ? Maybe(gateway) : std::nullopt;
+}
+
+Action NetShow(Arguments &)
+{
+    return [](Call &call) {
+        NetFacts facts = {FirstCard("show the network"), {}, PresentGateway(), PresentServers(), {}, {}};
         char name[64] = "";
-        char gateway[20] = "";
-        const bool named = TAVOLnxGetHostname(name, sizeof name) == 0;
-        const bool routed = TAVONetDefaultGatewayGet(gateway, sizeof gateway) == 0;
-        StringList servers;
-        TAVONetDNSGet(servers.Address());
-        const int wakes = TAVONetWolGet(card.szInterface);
+        if (TAVOLnxGetHostname(name, sizeof name) == 0)
+            facts.hostname = name;
+        StringList list;
+        if (TAVONetIPv6AddrEnum(facts.card.szInterface, list.Address()) >= 0)
+            facts.ipv6_addresses = list.Items();
+        if (const int wakes = TAVONetWolGet(facts.card.szInterface); wakes >= 0)
+            facts.wake_on_lan = wakes == 1;
+        call.One(net_columns, facts);
+    };
+}
 
-        Record record;
-        record.Add("hostname", named ? Cell(name) : Cell());
-        record.Add("interface", card.szInterface);
-        record.Add("mode", card.nMode == TAVO_NET_DHCP ? "dhcp" : "static");
-        record.Add("address", Known(card.szIp));
-        record.Add("mask", Known(card.szMask));
-        record.Add("network", Known(card.szNetwork));
-        record.Add("broadcast", Known(card.szBroadcast));
-        record.Add("gateway", Known(card.szGateway));
-        record.Add("live_gateway", routed ? Cell(gateway) : Cell());
-        record.Add("dns", servers.Items());
-        record.Add("mac", Known(card.szMac));
-        record.Add("mtu", card.nMtu);
-        record.Add("link", card.fLink != 0);
-        record.Add("ipv6", BlTAVONetIPv6IsEnabled(card.szInterface) == 1);
-        record.Add("ipv6_addresses", Ipv6Addresses(card.szInterface));
-        record.Add("wake_on_lan", wakes < 0 ? Cell() : Cell(wakes == 1));
-        call.Print(record);
-        return exit_done;
-    }
-};
+Action NetGateway(Arguments &in)
+{
+    const auto address = in.Text("ADDRESS", any_text, "of the router");
+    return [=](Call &call) {
+        // It is stored, too, so that the change is made in any case.
+        call.Change("network", "gateway", PresentGateway(), *address);
+        if (!call.dry_run)
+            Must(TAVONetDefaultGatewaySet(address->c_str()) == 0, "make " + *address + " the gateway",
+                 "is it on the network of an interface?");
+    };
+}
 
-class NetGateway : public Verb {
-  public:
-    static constexpr VerbInfo info = {"gateway", changes,
-                                      "Makes ADDRESS the default gateway and stores it. When it cannot be reached from "
-                                      "any interface the old one stays.",
-                                      "tavoctl net gateway 192.0.2.1"};
-
-    void Declare(Arguments &arguments) override { arguments.Text("ADDRESS", address_, "of the router"); }
-
-    int Run(const Call &) override
-    {
-        if (TAVONetDefaultGatewaySet(address_.c_str()) != 0)
-            throw LibraryFailure("make " + address_ + " the gateway", "is it on the network of an interface?");
-        return exit_done;
-    }
-
-  private:
-    std::string address_;
-};
-
-class NetDns : public Verb {
-  public:
-    static constexpr VerbInfo info = {"dns", changes,
-                                      "Replaces the name servers, in the order in which they are asked.",
-                                      "tavoctl net dns 192.0.2.53 2001:db8::53\n"
-                                      "tavoctl net dns --none"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Flag("--none", none_, "no name server at all");
-        arguments.Texts("ADDRESS", addresses_, "of a name server", 0);
-    }
-
-    int Run(const Call &) override
-    {
-        if (none_ != addresses_.empty())
-            throw UsageFailure("set the name servers", none_ ? "there are some, and --none" : "none was named",
+Action NetDns(Arguments &in)
+{
+    const auto none = in.Flag("--none", "no name server at all");
+    const auto addresses = in.Texts("ADDRESS", any_text, "of a name server", 0);
+    return [=](Call &call) {
+        if (*none != addresses->empty())
+            throw UsageFailure("set the name servers", *none ? "there are some, and --none" : "none was named",
                                "name them in the order in which they are asked, or say --none");
-        const StringList servers(addresses_);
-        if (TAVONetDNSSet(servers.Get()) != 0)
-            throw LibraryFailure("set the name servers", "a name server is an IPv4 or IPv6 address");
-        return exit_done;
-    }
+        call.Change("network", "dns", PresentServers(), *addresses);
+        if (call.Proceed())
+            Must(TAVONetDNSSet(StringList(*addresses).Get()) == 0, "set the name servers",
+                 "a name server is an IPv4 or IPv6 address");
+    };
+}
 
-  private:
-    bool none_ = false;
-    std::vector<std::string> addresses_;
-};
+Action NetHostname(Arguments &in)
+{
+    const auto name = in.Text("NAME", any_text, "the new host name");
+    return [=](Call &call) {
+        call.Change("network", "hostname", PresentHostname(), *name);
+        if (!call.dry_run)
+            Must(TAVOLnxSetHostname(name->c_str()) == 0, "name this appliance " + *name,
+                 "allowed: 1 to 15 letters, digits, \"-\" and \"_\", with a letter first");
+    };
+}
 
-class NetHostname : public Verb {
-  public:
-    static constexpr VerbInfo info = {"hostname", changes,
-                                      "Gives the appliance another name: in the kernel, in the stored settings and in "
-                                      "/etc/hosts. 1 to 15 letters, digits, \"-\" and \"_\".",
-                                      "tavoctl net hostname attic"};
+Action NetMtu(Arguments &in)
+{
+    const auto interface = in.Text("INTERFACE", interface_kind, interface_help);
+    const auto bytes = in.Number("BYTES", "BYTES", "68 to 65535", 68, 65535);
+    return [=](Call &call) {
+        call.Change(*interface, "mtu", {}, **bytes);
+        if (call.Proceed())
+            Must(TAVONetSetMTUValue(interface->c_str(), static_cast<int>(**bytes)) == 0,
+                 "set the MTU of " + *interface + " to " + std::to_string(**bytes),
+                 HintFor{ERR_OP_FAILURE, "the card does not take it"});
+    };
+}
 
-    void Declare(Arguments &arguments) override { arguments.Text("NAME", name_, "the new host name"); }
+Action NetRefresh(Arguments &)
+{
+    return [](Call &call) {
+        // The library finds out whether there is anything to do.
+        call.Change("network", "state", {}, "refreshed");
+        if (call.Proceed())
+            Must(TAVONetHostsRefresh() >= 0, "refresh the network");
+    };
+}
 
-    int Run(const Call &) override
-    {
-        if (TAVOLnxSetHostname(name_.c_str()) != 0)
-            throw LibraryFailure("name this appliance " + name_);
-        return exit_done;
-    }
-
-  private:
-    std::string name_;
-};
-
-class NetMtu : public Verb {
-  public:
-    static constexpr VerbInfo info = {"mtu", changes, "Sets and stores the MTU of an interface.",
-                                      "tavoctl net mtu eth0 9000"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("INTERFACE", interface_, "such as eth0", InterfaceNames);
-        arguments.Text("BYTES", bytes_, "68 to 65535");
-    }
-
-    int Run(const Call &) override
-    {
-        int mtu = 0;
-        const char *const end = bytes_.data() + bytes_.size();
-        if (const auto [stop, error] = std::from_chars(bytes_.data(), end, mtu); error != std::errc() || stop != end)
-            throw UsageFailure("set the MTU " + bytes_, "that is no number");
-        if (TAVONetSetMTUValue(interface_.c_str(), mtu) != 0)
-            throw LibraryFailure("set the MTU of " + interface_ + " to " + bytes_,
-                                 TLIBErrGet() == ERR_OP_FAILURE ? "the card does not take it" : "");
-        return exit_done;
-    }
-
-  private:
-    std::string interface_;
-    std::string bytes_;
-};
-
-class NetRefresh : public Verb {
-  public:
-    static constexpr VerbInfo info = {
-        "refresh", changes,
-        "Puts back what a program that died in the middle of a change has left, and brings "
-        "the appliance's name in /etc/hosts up to date. Never waits: it leaves both to a "
-        "program that is changing the network just now. The start of the network and the "
-        "DHCP client's hook run it.",
-        "tavoctl net refresh"};
-
-    int Run(const Call &) override
-    {
-        if (TAVONetHostsRefresh() < 0)
-            throw LibraryFailure("refresh the network");
-        return exit_done;
-    }
-};
-
-class NetCheckAddress : public Verb {
-  public:
-    static constexpr VerbInfo info = {
-        "check-address", reads,
-        "Tells whether another host uses ADDRESS already: \"free\", or \"used\" with exit status 4. Only a host that "
-        "answers a ping is noticed; the appliance's own address is free.",
-        "tavoctl net check-address 192.0.2.20\n"
-        "tavoctl net check-address --interface eth1 192.0.2.20"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Option("--interface", "NAME", interface_, "that would have the address (the first one)",
-                         InterfaceNames);
-        arguments.Text("ADDRESS", address_, "an IPv4 address");
-    }
-
-    int Run(const Call &call) override
-    {
-        const std::string attempted = "check " + address_;
-        if (interface_.empty())
-            interface_ = FirstCard(attempted).szInterface;
-        const int used = TAVOIIpConflict(interface_.c_str(), address_.c_str());
-        if (used < 0)
-            throw LibraryFailure(attempted);
-        Record record;
-        record.Add("address", address_);
-        record.Add("interface", interface_);
-        record.Add("used", used == 1);
-        call.PrintValue(used ? "used" : "free", record);
-        return used ? exit_busy : exit_done;
-    }
-
-  private:
-    std::string interface_;
-    std::string address_;
-};
+Action NetCheckAddress(Arguments &in)
+{
+    const auto wanted = in.Option("--interface", "NAME", interface_kind, "that would have the address (the first one)");
+    const auto address = in.Text("ADDRESS", any_text, "an IPv4 address");
+    return [=](Call &call) {
+        const std::string attempted = "check " + *address;
+        const std::string interface = *wanted ? **wanted : std::string(FirstCard(attempted).szInterface);
+        const int used = TAVOIIpConflict(interface.c_str(), address->c_str());
+        Must(used >= 0, attempted);
+        call.Value(used ? "used" : "free", address_columns, AddressUse{*address, interface, used == 1});
+        call.status = used ? exit_busy : exit_done;
+    };
+}
 
 }  // namespace
 
 void AddNet(Program &program)
 {
     Family &net = program.Add("net", "Interfaces, addresses, names and bonds");
-    net.Add<NetShow>();
-    AddNetSet(net);
-    net.Add<NetGateway>();
-    net.Add<NetDns>();
-    net.Add<NetHostname>();
-    net.Add<NetMtu>();
-    net.Add<NetCheckAddress>();
-    net.Add<NetRefresh>();
-    AddNetCards(net);
+    net.Add("show", reads, Answer::One(net_columns), R"(Shows the first wired interface, the gateway as it is stored and
+as it is used, the name servers and the host name.
+
+tavoctl net show
+tavoctl net show --json)",
+            NetShow);
+    net.Add("set", changes, Answer::Change(), R"(Gives an interface its address: one from DHCP, or a static one. If you
+reach the appliance by that very interface, say --try: unless the new settings are confirmed in time, here or with
+`tavoctl net confirm` from another connection, the old ones come back, also when this command has ended with its
+connection.
+
+tavoctl net set dhcp
+tavoctl net set 192.0.2.10/24 --gateway 192.0.2.1
+tavoctl net set --interface eth1 192.0.2.10/255.255.255.0
+tavoctl net set --try 60 192.0.2.20/24)",
+            NetSet);
+    net.Add("confirm", changes, Answer::Change(), R"(Keeps the settings that `tavoctl net set --try` has on trial.
+
+tavoctl net confirm)",
+            NetConfirm);
+    net.Add("gateway", changes, Answer::Change(), R"(Makes ADDRESS the default gateway and stores it. When it cannot be
+reached from any interface the old one stays.
+
+tavoctl net gateway 192.0.2.1)",
+            NetGateway);
+    net.Add("dns", changes, Answer::Change(), R"(Replaces the name servers, in the order in which they are asked.
+
+tavoctl net dns 192.0.2.53 2001:db8::53
+tavoctl net dns --none)",
+            NetDns);
+    net.Add("hostname", changes, Answer::Change(), R"(Gives the appliance another name: in the kernel, in the stored
+settings and in /etc/hosts. 1 to 15 letters, digits, "-" and "_".
+
+tavoctl net hostname attic)",
+            NetHostname);
+    net.Add("mtu", changes, Answer::Change(), R"(Sets and stores the MTU of an interface.
+
+tavoctl net mtu eth0 9000)",
+            NetMtu);
+    net.Add("check-address", reads, Answer::One(address_columns), R"(Tells whether another host uses ADDRESS already:
+"free", or "used" with exit status 4. Only a host that answers a ping is noticed; the appliance's own address is free.
+
+tavoctl net check-address 192.0.2.20
+tavoctl net check-address --interface eth1 192.0.2.20)",
+            NetCheckAddress);
+    net.Add("refresh", changes, Answer::Change(), R"(Puts back what a program that died in the middle of a change has
+left, and brings the appliance's name in /etc/hosts up to date. Never waits: it leaves both to a program that is changing
+the network just now. The start of the network and the DHCP client's hook run it.
+
+tavoctl net refresh)",
+            NetRefresh);
+    net.Add("ipv6", changes, Answer::Change(), R"(Switches IPv6 on an interface on or off, or gives it an address or,
+with --remove, takes one away.
+
+tavoctl net ipv6 eth0 off
+tavoctl net ipv6 eth0 2001:db8::10/64
+tavoctl net ipv6 eth0 2001:db8::10/64 --gateway 2001:db8::1
+tavoctl net ipv6 --remove eth0 2001:db8::10/64)",
+            NetIpv6);
+    net.Add("wol", changes, Answer::Change(),
+            R"(Lets an interface wake the appliance, or no more. On which packets is set
+by wol_enabled_options in /etc/tavoinfo.conf.
+
+tavoctl net wol eth0 on)",
+            NetWol);
+    net.Add("bonds", reads, Answer::List(bond_columns), R"(Lists the bonds: their mode, their members, and the switch at
+the other end of an 802.3ad one.
+
+tavoctl net bonds)",
+            NetBonds);
+    net.Add("bond", changes | destroys, Answer::Change(),
+            R"(Makes a bond of interfaces, changes it, or dissolves it (mode
+"none"). The network is stopped meanwhile. lacp is 802.3ad and wants a switch that knows it; adaptive spreads the load
+by itself; backup uses one card at a time.
+
+tavoctl net bond backup eth0 eth1
+tavoctl net bond --name bond0 lacp eth0 eth1
+tavoctl net bond --yes none)",
+            NetBond);
 }
 
 }  // namespace tavoctl

@@ -1,6 +1,5 @@
 // tavoctl net set: the address of an interface, on trial or for good.
 #include "frame/failure.h"
-#include "frame/table.h"
 #include "network/net_trial.h"
 #include "network/net_verbs.h"
 
@@ -45,92 +44,86 @@ TAVONETCARD WantedCard(const std::string &wanted)
     return card;
 }
 
-class NetSet : public Verb {
-  public:
-    static constexpr VerbInfo info = {
-        "set", changes,
-        "Gives an interface its address: one from DHCP, or a static one. Whoever reaches the appliance by that very "
-        "interface says --try: unless the new settings are confirmed in time, here or with `tavoctl net confirm` from "
-        "another connection, the old ones come back, also when this command has ended with its connection.",
-        "tavoctl net set dhcp\n"
-        "tavoctl net set 192.0.2.10/24 --gateway 192.0.2.1\n"
-        "tavoctl net set --interface eth1 192.0.2.10/255.255.255.0\n"
-        "tavoctl net set --try 60 192.0.2.20/24"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Option("--interface", "NAME", interface_, "which one (the first one)", InterfaceNames);
-        arguments.Option("--gateway", "ADDRESS", gateway_, "the default gateway, too");
-        arguments.Number("--try", "SECONDS", seconds_, "put the old settings back unless they are confirmed by then", 1,
-                         86400);
-        arguments.Text("ADDRESS", wanted_, "\"dhcp\", or an address with its mask");
-    }
-
-    int Run(const Call &) override
-    {
-        const std::string attempted = "change the address";
-        TAVONETCARD card = WantedCard(wanted_);
-        if (!gateway_.empty() && !BlTLIBIsIpAddr(gateway_.c_str()))
-            throw UsageFailure("make " + gateway_ + " the gateway", "no host can have that address");
-        if (interface_.empty())
-            interface_ = FirstCard(attempted).szInterface;
-        CheckInterface(attempted, interface_);
-        Put(card.szInterface, interface_);
-        if (seconds_ == 0) {
-            Change(card, NetSnapshot(interface_).Card());
-            return exit_done;
-        }
-        NetTrial trial(interface_, seconds_);
-        try {
-            Change(card, trial.Before());
-        } catch (Failure &failure) {
-            failure.hint += std::string(failure.hint.empty() ? "" : "; ") +
-                            (trial.GiveUp() ? "the old settings are back" : "the old settings could not be put back");
-            throw;
-        }
-        trial.Begin();
-        if (!trial.IsKept())
-            throw Failure{.attempted = "keep the new settings",
-                          .reason = "they were not confirmed, the old ones are back",
-                          .status = exit_failed};
-        return exit_done;
-    }
-
-  private:
-    void Change(const TAVONETCARD &card, const TAVONETCARD &before) const
-    {
-        const int result = TAVONetSetCard1(&card, before.szIp[0] ? &before : nullptr);
-        if (result != 0)
-            throw LibraryFailure("give " + interface_ + " the address " + wanted_,
-                                 result == -2 ? "it has the address, but that is not stored" : "the old one stays");
-        if (!gateway_.empty() && TAVONetDefaultGatewaySet(gateway_.c_str()) != 0)
-            throw LibraryFailure("make " + gateway_ + " the gateway", "the address is set");
-    }
-
-    std::string interface_;
-    std::string gateway_;
-    std::string wanted_;
-    int seconds_ = 0;
+// What the interface shall have, and the gateway if one was given.
+struct WantedNet {
+    TAVONETCARD card;
+    std::string text;
+    std::optional<std::string> gateway;
 };
 
-class NetConfirm : public Verb {
-  public:
-    static constexpr VerbInfo info = {
-        "confirm", changes, "Keeps the settings that `tavoctl net set --try` has on trial.", "tavoctl net confirm"};
+void ChangeCard(const WantedNet &wanted, const TAVONETCARD &before)
+{
+    const int result = TAVONetSetCard1(&wanted.card, before.szIp[0] ? &before : nullptr);
+    Must(result == 0, std::string("give ") + wanted.card.szInterface + " the address " + wanted.text,
+         result == -2 ? "it has the address, but that is not stored" : "the old one stays");
+    if (wanted.gateway)
+        Must(TAVONetDefaultGatewaySet(wanted.gateway->c_str()) == 0, "make " + *wanted.gateway + " the gateway",
+             "the address is set");
+}
 
-    int Run(const Call &) override
-    {
-        NetTrial::Confirm();
-        return exit_done;
+std::string AddressText(const TAVONETCARD &card)
+{
+    if (card.nMode == TAVO_NET_DHCP)
+        return "dhcp";
+    return card.szIp[0] ? std::string(card.szIp) + "/" + card.szMask : "";
+}
+
+void TryCard(const WantedNet &wanted, int seconds)
+{
+    NetTrial trial(wanted.card.szInterface, seconds);
+    try {
+        ChangeCard(wanted, trial.Before());
+    } catch (Failure &failure) {
+        failure.hint += std::string(failure.hint.empty() ? "" : "; ") +
+                        (trial.GiveUp() ? "the old settings are back" : "the old settings could not be put back");
+        throw;
     }
-};
+    trial.Begin();
+    if (!trial.IsKept())
+        throw Failure{.attempted = "keep the new settings",
+                      .reason = "they were not confirmed, the old ones are back",
+                      .status = exit_failed};
+}
 
 }  // namespace
 
-void AddNetSet(Family &net)
+Action NetSet(Arguments &in)
 {
-    net.Add<NetSet>();
-    net.Add<NetConfirm>();
+    constexpr int64_t longest_trial = 86400;
+    const auto interface = in.Option("--interface", "NAME", interface_kind, "which one (the first one)");
+    const auto gateway = in.Option("--gateway", "ADDRESS", any_text, "the default gateway, too");
+    const auto seconds =
+        in.Number("--try", "SECONDS", "put the old settings back unless they are confirmed by then", 1, longest_trial);
+    const auto address = in.Text("ADDRESS", any_text, "\"dhcp\", or an address with its mask");
+    return [=](Call &call) {
+        const std::string attempted = "change the address";
+        WantedNet wanted = {WantedCard(*address), *address, *gateway};
+        if (*gateway && !BlTLIBIsIpAddr((*gateway)->c_str()))
+            throw UsageFailure("make " + **gateway + " the gateway", "no host can have that address");
+        const std::string name = *interface ? **interface : std::string(FirstCard(attempted).szInterface);
+        CheckInterface(attempted, name);
+        Put(wanted.card.szInterface, name);
+        const TAVONETCARD before = NetSnapshot(name).Card();
+        // What is stored may differ from what the kernel has, so that the change is made in any case.
+        call.Change(name, "address", Maybe(AddressText(before)), AddressText(wanted.card));
+        if (*gateway)
+            call.Change("network", "gateway", {}, **gateway);
+        if (call.dry_run)
+            return;
+        if (*seconds)
+            TryCard(wanted, static_cast<int>(**seconds));
+        else
+            ChangeCard(wanted, before);
+    };
+}
+
+Action NetConfirm(Arguments &)
+{
+    return [](Call &call) {
+        call.Change("network", "trial", "running", "kept");
+        if (call.Proceed())
+            NetTrial::Confirm();
+    };
 }
 
 }  // namespace tavoctl

@@ -1,8 +1,8 @@
-// The verbs of tavoctl net stand in several files.
+// The verbs of tavoctl net that are in files of their own.
 #ifndef TAVOCTL_NET_VERBS_H
 #define TAVOCTL_NET_VERBS_H
 
-#include "frame/program.h"
+#include "frame/verb.h"
 #include "network/net_snapshot.h"
 
 namespace tavoctl {
@@ -10,8 +10,32 @@ namespace tavoctl {
 // The network interfaces of the kernel, without the loopback.
 std::vector<std::string> InterfaceNames();
 
-void AddNetSet(Family &net);    // addresses, on trial or for good
-void AddNetCards(Family &net);  // IPv6, wake-on-LAN, bonds
+extern const ArgumentKind interface_kind;
+inline constexpr char interface_help[] = "such as eth0";
+
+// Addresses, on trial or for good.
+Action NetSet(Arguments &in);
+Action NetConfirm(Arguments &in);
+
+// IPv6, wake-on-LAN, bonds.
+Action NetIpv6(Arguments &in);
+Action NetWol(Arguments &in);
+Action NetBonds(Arguments &in);
+Action NetBond(Arguments &in);
+
+struct BondFacts {
+    std::string bond;
+    std::optional<std::string> mode;
+    std::vector<std::string> members;
+    std::optional<std::string> partner;
+};
+
+inline constexpr Column<BondFacts> bond_columns[] = {
+    {"bond", field<&BondFacts::bond>},
+    {"mode", field<&BondFacts::mode>, "lacp, adaptive or backup; null: another one"},
+    {"members", field<&BondFacts::members>},
+    {"partner", field<&BondFacts::partner>, "the switch at the other end of an 802.3ad bond"},
+};
 
 }  // namespace tavoctl
 

@@ -6,29 +6,14 @@
 #include "frame/failure.h"
 #include "frame/held_locks.h"
 #include "frame/program.h"
-#include "frame/table.h"
 #include "frame/watch.h"
 #include "service/service_state.h"
 
 #include "tavo_lock.h"
 #include "tavo_service.h"
 
-#include <algorithm>
-
 namespace tavoctl {
 namespace {
-
-using tavoctl::Known;
-
-Cell Known(const std::optional<bool> &truth)
-{
-    return truth ? Cell(*truth) : Cell();
-}
-
-Cell Known(pid_t pid)
-{
-    return pid > 0 ? Cell(int{pid}) : Cell();
-}
 
 // The settings lock, so that every status of one table is of one moment and none of them waits on its own. Where somebody
 // holds it, such as the dispatcher while scripts run, the table says what can be said.
@@ -49,112 +34,118 @@ class OneMoment {
     bool held_;
 };
 
-class ServiceList : public Verb {
-  public:
-    static constexpr VerbInfo info = {
-        "list", reads,
-        "Lists the services that this model has. Shows whether each is enabled and running, the process and since "
-        "when, its "
-        "data folders and the volumes where they are. \"bound\" says whether all of them are there.",
-        "tavoctl service list\n"
-        "tavoctl service list --all --json\n"
-        "tavoctl service list --volume /volume1\n"
-        "tavoctl service list --watch --interval 5"};
+std::vector<std::string> NamesToList(bool all, const std::optional<std::string> &volume)
+{
+    if (all && !volume)
+        return ServiceNames();
+    StringList names;
+    const int count =
+        volume ? TAVOServiceGetbyVolume(volume->c_str(), names.Address()) : TAVOServiceGetAll(names.Address());
+    Must(count >= 0, "list the services" + (volume ? " of " + *volume : ""));
+    return names.Items();
+}
 
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Flag("--all", all_, "those too that this model has not");
-        arguments.Option("--volume", "VOLUME", volume_, "only those with data on that volume", MountedVolumes);
-        arguments.Flag("--watch", watch_, watch_help);
-        arguments.Number("--interval", "SECONDS", interval_, "the time between two looks (2)", 1);
-    }
-
-    int Run(const Call &call) override
-    {
-        if (watch_)
-            Watch(call, interval_, [this] { return Look(); });
+Action ServiceList(Arguments &in)
+{
+    const auto all = in.Flag("--all", "those too that this model has not");
+    const auto volume = in.Option("--volume", "VOLUME", mounted_kind, "only those with data on that volume");
+    const auto watch = in.Flag("--watch", watch_help);
+    const auto interval = in.Number("--interval", "SECONDS", "the time between two looks (2)", 1);
+    return [=](Call &call) {
+        const auto look = [&] {
+            const OneMoment moment;
+            std::vector<ServiceState> states;
+            for (const std::string &name : NamesToList(*all, *volume))
+                states.push_back(StateOf(FindService(name), moment.Held()));
+            return call.TableOf(service_columns, states);
+        };
+        if (*watch)
+            Watch(call, static_cast<int>(interval->value_or(2)), look);
         else
-            call.Print(Look());
-        return exit_done;
-    }
+            call.Print(look());
+    };
+}
 
-  private:
-    std::vector<std::string> Names() const
-    {
-        if (all_ && volume_.empty())
-            return ServiceNames();
-        StringList names;
-        const int count = volume_.empty() ? TAVOServiceGetAll(names.Address())
-                                          : TAVOServiceGetbyVolume(volume_.c_str(), names.Address());
-        if (count < 0)
-            throw LibraryFailure("list the services" + (volume_.empty() ? "" : " of " + volume_));
-        return names.Items();
-    }
-
-    Table Look() const
-    {
-        const OneMoment moment;
-        Table table({"name", "enabled", "running", "pid", "since", "shares", "volumes", "bound"});
-        for (const std::string &name : Names()) {
-            const ServiceState state = StateOf(FindService(name), moment.Held());
-            table.Add({state.name, Known(state.enabled), Known(state.running), Known(state.pid), Known(state.since),
-                       state.shares, state.volumes, Known(state.bound)});
-        }
-        return table;
-    }
-
-    bool all_ = false;
-    bool watch_ = false;
-    int interval_ = 2;
-    std::string volume_;
-};
-
-class ServiceStatus : public Verb {
-  public:
-    static constexpr VerbInfo info = {
-        "status", reads,
-        "Describes one service. \"on\" is the library's answer: enabled, its data folders there, and running. The exit "
-        "status is 3 when it is not running.",
-        "tavoctl service status samba\n"
-        "tavoctl service status --json ftp"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("SERVICE", name_, "the name of the service", ServiceNames);
-    }
-
-    int Run(const Call &call) override
-    {
-        const int id = FindService(name_);
+Action ServiceStatus(Arguments &in)
+{
+    const auto name = in.Text("SERVICE", service_kind, service_help);
+    return [=](Call &call) {
+        const int id = FindService(*name);
         const HeldLocks locks(TAVO_LOCK_TAVOINFO, true, usual_wait);
         const ServiceState state = StateOf(id);
-        Record record;
-        record.Add("name", state.name);
-        record.Add("on", TAVOServiceStatusGet(id) == 1);
-        record.Add("enabled", Known(state.enabled));
-        record.Add("running", Known(state.running));
-        record.Add("pid", Known(state.pid));
-        record.Add("since", Known(state.since));
-        record.Add("shares", state.shares);
-        record.Add("volumes", state.volumes);
-        record.Add("bound", Known(state.bound));
-        call.Print(record);
-        return state.running == true ? exit_done : exit_not_found;
-    }
-
-  private:
-    std::string name_;
-};
+        call.One(service_columns, state);
+        call.status = state.running == true ? exit_done : exit_not_found;
+    };
+}
 
 }  // namespace
 
 void AddService(Program &program)
 {
     Family &service = program.Add("service", "The appliance's services");
-    service.Add<ServiceList>();
-    service.Add<ServiceStatus>();
-    AddServiceSwitches(service);
-    AddServiceVolumes(service);
+    service.Add("list", reads, Answer::List(service_columns), R"(Lists the services that this model has. Shows whether
+each is enabled and running, the process and since when, its data folders and the volumes where they are. "bound" says
+whether all of them are there.
+
+tavoctl service list
+tavoctl service list --all --json
+tavoctl service list --volume /volume1
+tavoctl service list --watch --interval 5)",
+                ServiceList);
+    service.Add("status", reads, Answer::One(service_columns), R"(Describes one service. "on" is the library's answer:
+enabled, its data folders there, and running. The exit status is 3 when it is not running.
+
+tavoctl service status samba
+tavoctl service status --json ftp)",
+                ServiceStatus);
+    service.Add("enable", changes, Answer::Change(), R"(Enables services. Binds their data folders, on the volume where
+they are or else on the one with the most free space, sets their keys and starts them. Refuses a service whose data is
+on a volume that is not mounted.
+
+tavoctl service enable samba
+tavoctl service enable --wait 10 ftp ssh
+tavoctl service enable --dry-run media)",
+                ServiceEnable);
+    service.Add("disable", changes, Answer::Change(), R"(Disables services. Sets their keys, stops them and releases
+their data folders. Data is not deleted, and a folder that another enabled service uses stays bound.
+
+tavoctl service disable telnet)",
+                ServiceDisable);
+    service.Add("start", changes, Answer::Change(), R"(Starts services; whether they are enabled stays as it is.
+
+tavoctl service start --wait 10 crond)",
+                ServiceStart);
+    service.Add("stop", changes, Answer::Change(), R"(Stops services until they are started again; whether they are
+enabled stays as it is.
+
+tavoctl service stop media itunes)",
+                ServiceStop);
+    service.Add("restart", changes, Answer::Change(), R"(Restarts services.
+
+tavoctl service restart DB
+tavoctl service restart --wait 10 web)",
+                ServiceRestart);
+    service.Add("reload", changes, Answer::Change(),
+                R"(Sends running services a hang-up signal, on which they read their
+settings again.
+
+tavoctl service reload samba)",
+                ServiceReload);
+    service.Add("volume", changes, Answer::Change(), R"(Binds the data folders of a service to another volume and
+restarts the enabled services that use them. The data itself is not moved.
+
+tavoctl service volume web /volume2
+tavoctl service volume --force web /volume3
+tavoctl service volume --dry-run media 2)",
+                ServiceVolume);
+    service.Add("restore", changes, Answer::Change(),
+                R"(Brings services back after their volume has come back. Binds the
+data folders that are on it again and starts the enabled services that use them. Without VOLUME: enables the services
+again that have lost theirs, on the volumes that there are.
+
+tavoctl service restore /volume1
+tavoctl service restore)",
+                ServiceRestore);
 }
 
 }  // namespace tavoctl

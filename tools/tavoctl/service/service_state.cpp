@@ -5,6 +5,7 @@
 #include "frame/failure.h"
 #include "frame/host.h"
 #include "frame/processes.h"
+#include "frame/suggestion.h"
 
 #include "tavo_file.h"
 #include "tavo_proc.h"
@@ -62,7 +63,7 @@ int FindService(const std::string &name)
     if (id < 0)
         throw Failure{.attempted = "find the service " + name,
                       .reason = "there is none of that name",
-                      .hint = "tavoctl service list --all shows them",
+                      .hint = DidYouMean(name, ServiceNames(), "tavoctl service list --all shows them"),
                       .status = exit_not_found};
     return id;
 }
@@ -120,6 +121,24 @@ bool IsMounted(const std::string &volume)
 {
     const std::vector<std::string> volumes = MountedVolumes();
     return std::find(volumes.begin(), volumes.end(), volume) != volumes.end();
+}
+
+const ArgumentKind service_kind = {.name = "service", .candidates = ServiceNames, .sample = "no-service"};
+
+const ArgumentKind mounted_kind = {.name = "volume", .candidates = MountedVolumes, .sample = "/volume9998"};
+
+std::string VolumePath(const std::string &word)
+{
+    return word.starts_with("/") ? word : "/volume" + word;
+}
+
+void RequireMounted(const std::string &volume)
+{
+    if (!IsMounted(volume))
+        throw Failure{.attempted = "use the volume " + volume,
+                      .reason = "it is not mounted",
+                      .hint = "volumes are /volume1, /volume2, ... in /proc/mounts",
+                      .status = exit_not_found};
 }
 
 }  // namespace tavoctl

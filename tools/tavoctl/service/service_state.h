@@ -2,6 +2,11 @@
 #ifndef TAVOCTL_SERVICE_STATE_H
 #define TAVOCTL_SERVICE_STATE_H
 
+#include "frame/argument_kind.h"
+#include "frame/column.h"
+
+#include "tavo_service.h"
+
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -22,6 +27,31 @@ struct ServiceState {
     std::vector<std::string> volumes;  // where the links of its data folders lead, each volume once
     std::optional<bool> bound;         // empty: it has no data folders; false: one of them is not there
 };
+
+inline constexpr Column<ServiceState> service_columns[] = {
+    {"name", field<&ServiceState::name>},
+    {"on", [](const ServiceState &s) { return TAVOServiceStatusGet(s.id) == 1; }, "enabled, bound and running", in_one},
+    {"enabled", field<&ServiceState::enabled>, "null: it has no key, or its key says neither yes nor no"},
+    {"running", field<&ServiceState::running>, "null: nothing of its own runs"},
+    {"pid",
+     [](const ServiceState &s) {
+         return s.pid > 0 ? std::optional(s.pid) : std::nullopt;
+     }},
+    {"since", [](const ServiceState &s) { return Maybe(s.since); }, "when its process was started"},
+    {"shares", field<&ServiceState::shares>, "its data folders"},
+    {"volumes", field<&ServiceState::volumes>, "where they are"},
+    {"bound", field<&ServiceState::bound>, "whether all of them are there; null: it has none"},
+};
+
+extern const ArgumentKind service_kind;
+extern const ArgumentKind mounted_kind;  // a volume, "/volume2" or "2"
+inline constexpr char service_help[] = "the name of the service";
+
+// "/volume2", which may be written as "2".
+std::string VolumePath(const std::string &word);
+
+// Throws a Failure when it is not mounted.
+void RequireMounted(const std::string &volume);
 
 // The id of a service by its name. Throws a Failure.
 int FindService(const std::string &name);

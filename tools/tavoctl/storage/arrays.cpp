@@ -50,19 +50,40 @@ std::string Duration(uint64_t seconds)
 
 }  // namespace
 
+namespace {
+
+constexpr std::string_view array_device = "/dev/md";
+
+std::string_view ArrayNumber(std::string_view word)
+{
+    if (word.starts_with(array_device))
+        word.remove_prefix(array_device.size());
+    else if (word.starts_with("md"))
+        word.remove_prefix(2);
+    return word;
+}
+
+bool IsArrayName(const std::string &word)
+{
+    const std::string_view number = ArrayNumber(word);
+    return !number.empty() && number.size() < 6 &&
+           std::all_of(number.begin(), number.end(), [](unsigned char c) { return std::isdigit(c); });
+}
+
+}  // namespace
+
+const ArgumentKind array_kind = {
+    .name = "array",
+    .allowed = "the name of an array, md2 or /dev/md2",
+    .valid = IsArrayName,
+    .candidates = ArrayNames,
+    .sample = "md77",
+    .wrong = "sda",
+};
+
 std::string ArrayPath(const std::string &word)
 {
-    constexpr std::string_view whole = "/dev/md";
-    std::string_view number = word;
-    if (number.starts_with(whole))
-        number.remove_prefix(whole.size());
-    else if (number.starts_with("md"))
-        number.remove_prefix(2);
-    const bool plain = !number.empty() && number.size() < 6 &&
-                       std::all_of(number.begin(), number.end(), [](unsigned char c) { return std::isdigit(c); });
-    if (!plain)
-        throw UsageFailure("use " + word, "it is no name of an array", "say it as md2 or /dev/md2");
-    return std::string(whole).append(number);
+    return std::string(array_device).append(ArrayNumber(word));
 }
 
 Array ReadArray(const std::string &path)

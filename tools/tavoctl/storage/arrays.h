@@ -2,6 +2,8 @@
 #ifndef TAVOCTL_ARRAYS_H
 #define TAVOCTL_ARRAYS_H
 
+#include "frame/argument_kind.h"
+
 #include "tavo_raid.h"
 
 #include <memory>
@@ -16,7 +18,10 @@ struct FreeArray {
 };
 using Array = std::unique_ptr<RAIDINFO, FreeArray>;
 
-// "/dev/md2" of "md2", "2" or "/dev/md2"; throws a Failure for anything else.
+extern const ArgumentKind array_kind;
+inline constexpr char array_help[] = "its name, md2 or /dev/md2";
+
+// "/dev/md2" of "md2", "2" or "/dev/md2".
 std::string ArrayPath(const std::string &word);
 
 // Throws a Failure when there is no such array.

@@ -3,6 +3,7 @@
 
 #include "frame/containers.h"
 #include "frame/failure.h"
+#include "frame/suggestion.h"
 
 #include "tavo_partition.h"
 
@@ -42,17 +43,26 @@ std::vector<std::string> Names(const PARTITIONFILTER &filter)
     return names;
 }
 
+bool IsDeviceName(const std::string &word)
+{
+    const std::string name = word.starts_with(dev) ? word.substr(dev.size()) : word;
+    return !name.empty() && name.front() != '-' && std::all_of(name.begin(), name.end(), [](unsigned char c) {
+        return std::isalnum(c) || c == '-' || c == '_';
+    });
+}
+
+bool IsDiskName(const std::string &word)
+{
+    DISKPATH parsed;
+    return IsDeviceName(word) && DiskPathParse(DevicePath(word).c_str(), &parsed) == 0 && parsed.nPartition == 0 &&
+           !std::isdigit(static_cast<unsigned char>(word.back()));
+}
+
 }  // namespace
 
 std::string DevicePath(const std::string &word)
 {
-    const std::string name = word.starts_with(dev) ? word.substr(dev.size()) : word;
-    const bool plain = !name.empty() && std::all_of(name.begin(), name.end(), [](unsigned char c) {
-        return std::isalnum(c) || c == '-' || c == '_';
-    });
-    if (!plain || name.front() == '-')
-        throw UsageFailure("use " + word, "it is no name of a device", "say it as sda3 or /dev/sda3");
-    return std::string(dev) + name;
+    return word.starts_with(dev) ? word : std::string(dev) + word;
 }
 
 std::vector<std::string> DevicePaths(const std::vector<std::string> &words)
@@ -71,13 +81,10 @@ std::string DeviceName(const std::string &path)
 std::string DiskPath(const std::string &word)
 {
     const std::string path = DevicePath(word);
-    DISKPATH parsed;
-    if (DiskPathParse(path.c_str(), &parsed) != 0 || parsed.nPartition != 0 ||
-        std::isdigit(static_cast<unsigned char>(path.back())))
-        throw UsageFailure("use " + word, "it is no name of a disk", "say it as sda or /dev/sda");
     struct stat state;
     if (::stat(path.c_str(), &state) != 0)
-        throw NotFound("use " + path, ERR_FILE_NOT_FOUND, "tavoctl disk list shows the disks");
+        throw NotFound("use " + path, ERR_FILE_NOT_FOUND,
+                       DidYouMean(DeviceName(path), DiskNames(), "tavoctl disk list shows the disks"));
     return path;
 }
 
@@ -174,12 +181,22 @@ std::optional<std::string> KernelText(const std::string &path)
     return line;
 }
 
-std::string Listed(const std::vector<std::string> &words)
-{
-    std::string text;
-    for (const std::string &word : words)
-        text += (text.empty() ? "" : ", ") + word;
-    return text;
-}
+const ArgumentKind disk_kind = {
+    .name = "disk",
+    .allowed = "the name of a disk, sda or /dev/sda",
+    .valid = IsDiskName,
+    .candidates = DiskNames,
+    .sample = "sdzz",
+    .wrong = "sda3",
+};
+
+const ArgumentKind device_kind = {
+    .name = "device",
+    .allowed = "the name of a device, sda3 or /dev/sda3",
+    .valid = IsDeviceName,
+    .candidates = DeviceNames,
+    .sample = "sdzz3",
+    .wrong = "../sda3",
+};
 
 }  // namespace tavoctl

@@ -2,6 +2,10 @@
 #ifndef TAVOCTL_DEVICE_H
 #define TAVOCTL_DEVICE_H
 
+#include "frame/argument_kind.h"
+#include "frame/column.h"
+#include "frame/terminal_text.h"
+
 #include "tavo_disk.h"
 
 #include <optional>
@@ -11,12 +15,12 @@
 
 namespace tavoctl {
 
-// "/dev/sda3" of "sda3" or "/dev/sda3"; throws a Failure for what is no plain name of a device.
+// "/dev/sda3" of "sda3" or "/dev/sda3".
 std::string DevicePath(const std::string &word);
 std::vector<std::string> DevicePaths(const std::vector<std::string> &words);
 std::string DeviceName(const std::string &path);  // "sda3"
 
-// The disk, whole, that a path names; throws a Failure when it is none, or not there.
+// The path of a whole disk; throws a Failure when it is not there.
 std::string DiskPath(const std::string &word);
 
 // All disks: the internal bays in their order, then the others by name.
@@ -58,8 +62,12 @@ void RefuseUsed(const std::vector<std::string> &devices, const std::string &atte
 // The first line of a file of the kernel's.
 std::optional<std::string> KernelText(const std::string &path);
 
-// "/dev/sda, /dev/sdb"
-std::string Listed(const std::vector<std::string> &words);
+inline constexpr char disk_help[] = "its name, sda or /dev/sda";
+inline constexpr char member_help[] = "a partition or disk, sda3 or /dev/sda3";
+inline constexpr char wake_help[] = "read it although that wakes it";
+
+extern const ArgumentKind disk_kind;    // "sda" or "/dev/sda"
+extern const ArgumentKind device_kind;  // a disk, a partition, an array
 
 }  // namespace tavoctl
 

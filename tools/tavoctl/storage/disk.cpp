@@ -2,206 +2,313 @@
 #include "families.h"
 #include "frame/failure.h"
 #include "frame/program.h"
-#include "frame/table.h"
 #include "storage/arrays.h"
 #include "storage/device.h"
-#include "storage/disk_power.h"
-#include "storage/disk_verb.h"
 #include "storage/smart.h"
 
 #include "tavo_lvm.h"
 #include "tavo_partition.h"
 
-#include <algorithm>
-
 namespace tavoctl {
 namespace {
 
-// What is known of a disk without waking it.
+// A disk, and what was found out without waking it.
 struct DiskFacts {
     std::string path;
     Power power;
-    Cell model, size, temperature, layout;
-
-    DiskFacts(const std::string &disk, bool wake) : path(disk), power(PowerOf(disk))
-    {
-        char text[128];
-        if (TAVOLnxDiskGetModel(disk.c_str(), text, sizeof text) == 0)
-            model = std::string(text).substr(0, std::string(text).find_last_not_of(' ') + 1);
-        uint64_t sectors = 0;
-        if (DiskSizeGet(disk.c_str(), &sectors) == 1)
-            size = Bytes{sectors * 512};
-        if (power != Power::spinning && !wake)
-            return;
-        layout = Layout();
-        if (const int degrees = TAVODiskTemperatureGet(disk.c_str()); degrees != -1)
-            temperature = degrees;
-    }
-
-    Cell State() const
-    {
-        return power == Power::unknown ? Cell() : Cell(power == Power::standby ? "standby" : "spinning");
-    }
-
-  private:
-    Cell Layout() const
-    {
-        int version = 0;
-        for (const int raid : {1, 0}) {
-            if (BlTAVOCheckPartitionLayout(path.c_str(), raid, &version) == 1)
-                return "version " + std::to_string(version) + (raid ? "" : " plain");
-        }
-        int kind = 0;
-        if (PartitionTableTypeGet(path.c_str(), &kind) != 0)
-            return {};
-        return kind == PARTITION_TABLE_NONE ? "blank" : "foreign";
-    }
+    bool asked;  // it may be read
+    std::optional<std::string> model, layout;
+    std::optional<Bytes> size;
+    std::optional<int> temperature;
+    std::vector<std::string> role;
 };
 
-class DiskList : public Verb {
-  public:
-    static constexpr VerbInfo info = {
-        "list", reads,
-        "Lists the disks, those of the bays first, and the arrays that each serves. A disk "
-        "in standby is not read, so its temperature and layout are not known.",
-        "tavoctl disk list\n"
-        "tavoctl disk list --wake --json"};
+constexpr Column<DiskFacts> disk_columns[] = {
+    {"bay", [](const DiskFacts &d) { return BayOf(d.path); }, "1 for an internal bay, 1-2 in a unit, usb, esata"},
+    {"disk",
+     [](const DiskFacts &d) {
+         return DeviceName(d.path);
+     }},
+    {"path", field<&DiskFacts::path>, "", in_details},
+    {"model", field<&DiskFacts::model>},
+    {"size", field<&DiskFacts::size>},
+    {"solid_state",
+     [](const DiskFacts &d) {
+         const int solid = d.asked ? TAVODiskIsSSD(d.path.c_str()) : -1;
+         return solid < 0 ? std::nullopt : std::optional(solid == 1);
+     },
+     "", in_one},
+    {"temperature", field<&DiskFacts::temperature>, "", in_list, "degrees Celsius"},
+    {"state",
+     [](const DiskFacts &d) {
+         return Maybe(d.power == Power::unknown ? "" : d.power == Power::standby ? "standby" : "spinning");
+     },
+     "standby or spinning"},
+    {"write_cache",
+     [](const DiskFacts &d) {
+         return d.asked ? std::optional(TAVODiskWriteCacheGet(d.path.c_str()) == 1) : std::nullopt;
+     },
+     "", in_one},
+    {"layout", field<&DiskFacts::layout>, "of the system, or blank, or foreign"},
+    {"role", field<&DiskFacts::role>, "the arrays that it serves"},
+    {"use", [](const DiskFacts &d) { return Maybe(UseOf(d.path)); }, "why it must not be overwritten", in_one},
+};
 
-    void Declare(Arguments &arguments) override { arguments.Flag("--wake", wake_, wake_help); }
+struct DiskTemperature {
+    std::string disk;
+    int temperature;
+};
 
-    int Run(const Call &call) override
-    {
+constexpr Column<DiskTemperature> temperature_columns[] = {
+    {"disk", field<&DiskTemperature::disk>},
+    {"temperature", field<&DiskTemperature::temperature>, "", in_list, "degrees Celsius"},
+};
+
+constexpr Column<SmartAttribute> smart_columns[] = {
+    {"id", field<&SmartAttribute::id>},
+    {"name",
+     [](const SmartAttribute &a) {
+         return std::string(SmartName(a.id));
+     }},
+    {"value", field<&SmartAttribute::value>},
+    {"worst", field<&SmartAttribute::worst>},
+    {"threshold",
+     [](const SmartAttribute &a) {
+         return a.threshold < 0 ? std::nullopt : std::optional(a.threshold);
+     }},
+    {"state", [](const SmartAttribute &a) -> std::string { return a.Fails() ? "failing" : "good"; }, "failing or good"},
+    {"raw", field<&SmartAttribute::raw>},
+};
+
+struct WipingJob {
+    std::string disk;
+    uint64_t done, total;  // MiB
+};
+
+constexpr uint64_t mib = 1 << 20;
+
+constexpr Column<WipingJob> wiping_columns[] = {
+    {"disk", field<&WipingJob::disk>},
+    {"done",
+     [](const WipingJob &job) {
+         return Bytes{job.done * mib};
+     }},
+    {"total",
+     [](const WipingJob &job) {
+         return Bytes{job.total * mib};
+     }},
+    {"percent",
+     [](const WipingJob &job) {
+         return job.total ? std::optional(job.done * 100 / job.total) : std::nullopt;
+     }},
+};
+
+std::optional<std::string> LayoutOf(const std::string &disk)
+{
+    int version = 0;
+    for (const int raid : {1, 0})
+        if (BlTAVOCheckPartitionLayout(disk.c_str(), raid, &version) == 1)
+            return "version " + std::to_string(version) + (raid ? "" : " plain");
+    int kind = 0;
+    if (PartitionTableTypeGet(disk.c_str(), &kind) != 0)
+        return {};
+    return kind == PARTITION_TABLE_NONE ? "blank" : "foreign";
+}
+
+DiskFacts DescribeDisk(const std::string &path, bool wake, const std::vector<Array> &arrays)
+{
+    DiskFacts disk = {path, PowerOf(path), wake, {}, {}, {}, {}, ArraysOf(arrays, path)};
+    disk.asked = wake || disk.power == Power::spinning;
+    char text[128];
+    if (TAVOLnxDiskGetModel(path.c_str(), text, sizeof text) == 0)
+        disk.model = std::string(text).substr(0, std::string(text).find_last_not_of(' ') + 1);
+    uint64_t sectors = 0;
+    if (DiskSizeGet(path.c_str(), &sectors) == 1)
+        disk.size = Bytes{sectors * 512};
+    if (!disk.asked)
+        return disk;
+    disk.layout = LayoutOf(path);
+    if (const int degrees = TAVODiskTemperatureGet(path.c_str()); degrees != -1)
+        disk.temperature = degrees;
+    return disk;
+}
+
+Action DiskList(Arguments &in)
+{
+    const auto wake = in.Flag("--wake", wake_help);
+    return [=](Call &call) {
         const std::vector<Array> arrays = ReadArrays();
-        Table table({"bay", "disk", "model", "size", "temperature", "state", "layout", "role"});
-        for (const std::string &path : DiskPaths()) {
-            const DiskFacts disk(path, wake_);
-            table.Add({BayOf(path), DeviceName(path), disk.model, disk.size, disk.temperature, disk.State(),
-                       disk.layout, ArraysOf(arrays, path)});
-        }
-        call.Print(table);
-        return exit_done;
-    }
+        std::vector<DiskFacts> disks;
+        for (const std::string &path : DiskPaths())
+            disks.push_back(DescribeDisk(path, *wake, arrays));
+        call.List(disk_columns, disks);
+    };
+}
 
-  private:
-    bool wake_ = false;
-};
+Action DiskInfo(Arguments &in)
+{
+    const auto disk = in.Text("DISK", disk_kind, disk_help);
+    const auto wake = in.Flag("--wake", wake_help);
+    return [=](Call &call) {
+        call.One(disk_columns, DescribeDisk(DiskPath(*disk), *wake, ReadArrays()));
+    };
+}
 
-class DiskInfo : public WakingVerb {
-  public:
-    static constexpr VerbInfo info = {
-        "info", reads, "Shows what is known of a disk. One in standby is not read unless --wake is given.",
-        "tavoctl disk info sda\n"
-        "tavoctl disk info --wake --json /dev/sdb"};
-
-    int Run(const Call &call) override
-    {
-        const std::string path = DiskPath(disk_);
-        const DiskFacts disk(path, wake_);
-        const bool asked = wake_ || disk.power == Power::spinning;
-        const int solid = asked ? TAVODiskIsSSD(path.c_str()) : -1;
-        Record record;
-        record.Add("disk", path);
-        record.Add("bay", BayOf(path));
-        record.Add("model", disk.model);
-        record.Add("size", disk.size);
-        record.Add("solid_state", solid < 0 ? Cell() : Cell(solid == 1));
-        record.Add("temperature", disk.temperature);
-        record.Add("state", disk.State());
-        record.Add("write_cache", asked ? Cell(TAVODiskWriteCacheGet(path.c_str()) == 1) : Cell());
-        record.Add("layout", disk.layout);
-        record.Add("role", ArraysOf(ReadArrays(), path));
-        record.Add("use", Known(UseOf(path)));
-        call.Print(record);
-        return exit_done;
-    }
-};
-
-class DiskSmart : public WakingVerb {
-  public:
-    static constexpr VerbInfo info = {"smart", reads,
-                                      "Lists the SMART attributes of a disk: the drive's own value counts down from "
-                                      "100 or so, and at its threshold the "
-                                      "drive expects to fail. A disk in standby is not read unless --wake is given.",
-                                      "tavoctl disk smart sda\n"
-                                      "tavoctl disk smart --wake --json sdb"};
-
-    int Run(const Call &call) override
-    {
-        const std::string path = DiskPath(disk_);
+Action DiskSmart(Arguments &in)
+{
+    const auto disk = in.Text("DISK", disk_kind, disk_help);
+    const auto wake = in.Flag("--wake", wake_help);
+    return [=](Call &call) {
+        const std::string path = DiskPath(*disk);
         const std::string attempted = "read the SMART data of " + path;
-        RefuseToWake(path, wake_, attempted);
-        Table table({"id", "name", "value", "worst", "threshold", "state", "raw"});
-        for (const SmartAttribute &attribute : ReadSmart(path, attempted))
-            table.Add({attribute.id, SmartName(attribute.id), attribute.value, attribute.worst,
-                       attribute.threshold < 0 ? Cell() : Cell(attribute.threshold),
-                       attribute.Fails() ? "failing" : "good", static_cast<int64_t>(attribute.raw)});
-        call.Print(table);
-        return exit_done;
-    }
-};
+        RefuseToWake(path, *wake, attempted);
+        call.List(smart_columns, ReadSmart(path, attempted));
+    };
+}
 
-class DiskTemperature : public WakingVerb {
-  public:
-    static constexpr VerbInfo info = {
-        "temperature", reads,
-        "Prints the temperature of a disk in degrees Celsius. A disk in standby is not read "
-        "unless --wake is given.",
-        "tavoctl disk temperature sda"};
-
-    int Run(const Call &call) override
-    {
-        const std::string path = DiskPath(disk_);
+Action ShowTemperature(Arguments &in)
+{
+    const auto disk = in.Text("DISK", disk_kind, disk_help);
+    const auto wake = in.Flag("--wake", wake_help);
+    return [=](Call &call) {
+        const std::string path = DiskPath(*disk);
         const std::string attempted = "read the temperature of " + path;
-        RefuseToWake(path, wake_, attempted);
+        RefuseToWake(path, *wake, attempted);
         const int degrees = TAVODiskTemperatureGet(path.c_str());
         if (degrees == -1)
             throw Failure{.attempted = attempted, .reason = "the disk does not tell it"};
-        Record record;
-        record.Add("disk", path);
-        record.Add("temperature", degrees);
-        call.PrintValue(std::to_string(degrees), record);
-        return exit_done;
-    }
-};
+        call.Value(std::to_string(degrees), temperature_columns, DiskTemperature{path, degrees});
+    };
+}
 
-class DiskWipeStatus : public DiskVerb {
-  public:
-    static constexpr VerbInfo info = {"wipe-status", reads, "Shows how far the wiping job of a disk has come.",
-                                      "tavoctl disk wipe-status sda"};
-
-    int Run(const Call &call) override
-    {
-        const std::string path = DevicePath(disk_);
+Action DiskWipeStatus(Arguments &in)
+{
+    const auto disk = in.Text("DISK", disk_kind, disk_help);
+    return [=](Call &call) {
+        const std::string path = DevicePath(*disk);
         const std::string attempted = "read how far the wiping of " + path + " has come";
         constexpr uint64_t untouched = ~uint64_t{0};
-        uint64_t done = untouched;
-        uint64_t total = untouched;
-        if (DiskDDStatusGet(path.c_str(), &done, &total) != 0)
+        WipingJob job = {path, untouched, untouched};
+        if (DiskDDStatusGet(path.c_str(), &job.done, &job.total) != 0)
             throw Failure{.attempted = attempted, .reason = "the job's file is malformed"};
-        if (done == untouched)
+        if (job.done == untouched)
             throw NotFound(attempted, ERR_FILE_NOT_FOUND, "no such job runs");
-        constexpr uint64_t mib = 1 << 20;
-        Record record;
-        record.Add("disk", path);
-        record.Add("done", Bytes{done * mib});
-        record.Add("total", Bytes{total * mib});
-        record.Add("percent", total ? Cell(static_cast<int>(done * 100 / total)) : Cell());
-        call.Print(record);
-        return exit_done;
-    }
+        call.One(wiping_columns, job);
+    };
+}
+
+// A number that is among those that the drives know is the library's business.
+constexpr ArgumentKind minutes_kind = {
+    .name = "minutes",
+    .allowed = "0, 1 to 21, multiples of 30 up to 330, and 480",
+    .valid =
+        [](const std::string &text) {
+            return !text.empty() && text.size() <= 3 && text.find_first_not_of("0123456789") == text.npos;
+        },
+    .sample = "20",
+    .wrong = "5x",
 };
+
+Action DiskStandby(Arguments &in)
+{
+    const auto words = in.Texts("DISK", disk_kind, disk_help, 0);
+    const auto all = in.Flag("--all", "all disks");
+    const auto timer = in.Option("--timer", "MINUTES", minutes_kind, "set the spin-down timer of all disks instead");
+    return [=](Call &call) {
+        if (!words->empty() + *all + timer->has_value() != 1)
+            throw UsageFailure("spin down", "name disks, or say --all, or --timer");
+        if (*timer) {
+            call.Change("all disks", "spin-down timer", {}, **timer);
+            if (call.Proceed("Set the spin-down timer of all disks?"))
+                Must(TAVODiskSetStandbyTimer(std::stoi(**timer)) == 0,
+                     "set the spin-down timer to " + **timer + " minutes",
+                     std::string("allowed: ") + minutes_kind.allowed);
+        } else if (*all) {
+            call.Change("all disks", "state", {}, "standby");
+            if (call.Proceed("Spin down all disks, the system's own too?"))
+                Must(TAVODiskSetStandby() == 0, "spin down all disks");
+        } else {
+            std::vector<std::string> paths;
+            for (const std::string &word : *words) {
+                paths.push_back(DiskPath(word));
+                call.Change(paths.back(), "state", {}, "standby");
+            }
+            if (!call.Proceed("Spin down " + Joined(paths, ", ") + "?"))
+                return;
+            // Flushing first: a later write would wake it again.
+            for (const std::string &path : paths)
+                Must(TAVOIDiskFlushBuffer(path.c_str()) == 0 && TAVOIDiskSetDiskStandby(path.c_str()) == 0,
+                     "spin down " + path);
+        }
+    };
+}
+
+Action DiskCache(Arguments &in)
+{
+    const auto disk = in.Text("DISK", disk_kind, disk_help);
+    const auto state = in.Choice("STATE", {"on", "off"}, "on or off");
+    return [=](Call &call) {
+        const std::string path = DiskPath(*disk);
+        const std::string attempted = "switch the write cache of " + path + " " + *state;
+        const int wanted = *state == "on";
+        call.Change(path, "write_cache", TAVODiskWriteCacheGet(path.c_str()) == 1, wanted == 1);
+        if (!call.Proceed())
+            return;
+        Must(TAVODiskWriteCacheSet(path.c_str(), wanted) == 0, attempted);
+        if (TAVODiskWriteCacheGet(path.c_str()) != wanted)
+            throw Failure{.attempted = attempted, .reason = "the drive has not done it"};
+    };
+}
 
 }  // namespace
 
 void AddDisk(Program &program)
 {
     Family &disk = program.Add("disk", "Disks: what they are, their health and their power");
-    disk.Add<DiskList>();
-    disk.Add<DiskInfo>();
-    disk.Add<DiskSmart>();
-    disk.Add<DiskTemperature>();
-    disk.Add<DiskWipeStatus>();
-    AddDiskPower(disk);
+    disk.Add("list", reads, Answer::List(disk_columns), R"(Lists the disks, those of the bays first, and the arrays that
+each serves. A disk in standby is not read, so its temperature and layout are not known.
+
+tavoctl disk list
+tavoctl disk list --wake --json)",
+             DiskList);
+    disk.Add("info", reads, Answer::One(disk_columns), R"(Shows what is known of a disk. One in standby is not read
+unless --wake is given.
+
+tavoctl disk info sda
+tavoctl disk info --wake --json /dev/sdb)",
+             DiskInfo);
+    disk.Add("smart", reads, Answer::List(smart_columns), R"(Lists the SMART attributes of a disk. The drive's own value
+counts down from 100 or so, and at its threshold the drive expects to fail. A disk in standby is not read unless --wake
+is given.
+
+tavoctl disk smart sda
+tavoctl disk smart --wake --json sdb)",
+             DiskSmart);
+    disk.Add("temperature", reads, Answer::One(temperature_columns), R"(Prints the temperature of a disk in degrees
+Celsius. A disk in standby is not read unless --wake is given.
+
+tavoctl disk temperature sda)",
+             ShowTemperature);
+    disk.Add("wipe-status", reads, Answer::One(wiping_columns), R"(Shows how far the wiping job of a disk has come.
+
+tavoctl disk wipe-status sda)",
+             DiskWipeStatus);
+    disk.Add("standby", changes | destroys, Answer::Change(),
+             R"(Writes out what the system holds for a disk and spins it
+down. --all does it to every disk, which takes more than ten seconds, the system's own and USB disks included. --timer
+sets after how many idle minutes the drives spin down by themselves: 0 never, 1 to 21, multiples of 30 up to 330, or
+480. The minutes are saved; the drives' own timer is 5.5 hours for every choice but 0, since it only backs up the
+system's.
+
+tavoctl disk standby sdb
+tavoctl disk standby --yes --all
+tavoctl disk standby --yes --timer 20)",
+             DiskStandby);
+    disk.Add("cache", changes, Answer::Change(), R"(Switches the write cache of a drive. With it a power failure loses
+what the drive has not written yet; without it writing is slower. `disk info` shows its state.
+
+tavoctl disk cache sda off)",
+             DiskCache);
 }
 
 }  // namespace tavoctl

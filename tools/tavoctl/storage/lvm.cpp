@@ -3,7 +3,6 @@
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/program.h"
-#include "frame/table.h"
 #include "storage/device.h"
 
 #include "tavo_lvm.h"
@@ -15,7 +14,39 @@
 namespace tavoctl {
 namespace {
 
-constexpr char group_help[] = "its name, vg1 or /dev/vg1";
+constexpr char vg_help[] = "its name, vg1 or /dev/vg1";
+
+struct PvFacts {
+    LVMPV pv;
+    std::string volume;  // that fills the group; empty when there is none
+};
+
+std::optional<Bytes> SizeOf(const LVMPV &pv)
+{
+    uint64_t sectors = 0;
+    return DiskSizeGet(pv.szPv, &sectors) == 1 ? std::optional(Bytes{sectors * 512}) : std::nullopt;
+}
+
+constexpr Column<PvFacts> pv_columns[] = {
+    {"device",
+     [](const PvFacts &p) {
+         return DeviceName(p.pv.szPv);
+     }},
+    {"size",
+     [](const PvFacts &p) {
+         return SizeOf(p.pv);
+     }},
+    {"group",
+     [](const PvFacts &p) {
+         return Maybe(DeviceName(p.pv.szVg));
+     }},
+    {"devices", [](const PvFacts &p) { return *p.pv.szVg ? std::optional<int>(p.pv.nPv) : std::nullopt; },
+     "of the group"},
+    {"volume", [](const PvFacts &p) { return Maybe(p.volume); }, "that fills the group"},
+    {"use", [](const PvFacts &p) { return Maybe(p.volume.empty() ? "" : UseOf(p.volume)); },
+     "why it must not be removed"},
+    {"uuid", [](const PvFacts &p) { return Maybe(p.pv.szUuid); }, "of the group"},
+};
 
 struct FreeVolumes {
     void operator()(LVMPVLIST *list) const { LVMPvSBListFree(list); }
@@ -24,8 +55,7 @@ struct FreeVolumes {
 std::vector<LVMPV> PhysicalVolumes()
 {
     LVMPVLIST *list = nullptr;
-    if (LVMPvSBEnum(&list) < 0)
-        throw LibraryFailure("list the physical volumes", log_hint);
+    Must(LVMPvSBEnum(&list) >= 0, "list the physical volumes", log_hint);
     const std::unique_ptr<LVMPVLIST, FreeVolumes> owner(list);
     std::vector<LVMPV> volumes;
     for (const LVMPVLIST *node = list; node; node = node->pNext)
@@ -33,31 +63,41 @@ std::vector<LVMPV> PhysicalVolumes()
     return volumes;
 }
 
-std::vector<std::string> GroupNames()
+std::vector<std::string> VgNames()
 {
     std::vector<std::string> names;
-    LVMPVLIST *list = nullptr;
-    if (LVMPvSBEnum(&list) > 0) {
-        const std::unique_ptr<LVMPVLIST, FreeVolumes> owner(list);
-        for (const LVMPVLIST *node = list; node; node = node->pNext) {
-            const std::string name = DeviceName(node->pv.szVg);
-            if (!name.empty() && (names.empty() || names.back() != name))
-                names.push_back(name);
-        }
+    for (const LVMPV &pv : PhysicalVolumes()) {
+        const std::string name = DeviceName(pv.szVg);
+        if (!name.empty() && (names.empty() || names.back() != name))
+            names.push_back(name);
     }
     return names;
 }
 
-std::string GroupPath(const std::string &word)
+std::string VgName(const std::string &word)
 {
-    const std::string name = word.starts_with("/dev/") ? word.substr(5) : word;
-    const bool plain =
-        name.starts_with("vg") && name.find("..") == name.npos &&
-        name.find_first_not_of("ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789_.+-") == name.npos;
-    if (!plain)
-        throw UsageFailure("use " + word, "it is no name of a volume group", "a name begins with vg");
-    return "/dev/" + name;
+    return word.starts_with("/dev/") ? word.substr(5) : word;
 }
+
+std::string VgPath(const std::string &word)
+{
+    return "/dev/" + VgName(word);
+}
+
+constexpr ArgumentKind vg_kind = {
+    .name = "volume group",
+    .allowed = "a name that begins with vg, vg1 or /dev/vg1",
+    .valid =
+        [](const std::string &word) {
+            const std::string name = VgName(word);
+            return name.starts_with("vg") && name.find("..") == name.npos &&
+                   name.find_first_not_of("ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789_.+-") ==
+                       name.npos;
+        },
+    .candidates = VgNames,
+    .sample = "vg77",
+    .wrong = "data",
+};
 
 void RefuseWithoutLvm(const std::string &attempted)
 {
@@ -66,12 +106,12 @@ void RefuseWithoutLvm(const std::string &attempted)
 }
 
 // Throws a Failure when there is no such group.
-LVMVG ReadGroup(const std::string &path, const std::string &attempted)
+LVMVG ReadVg(const std::string &path, const std::string &attempted)
 {
+    RefuseWithoutLvm(attempted);
     LVMVG group;
     const int found = LVMVgSBGet(path.c_str(), &group);
-    if (found < 0)
-        throw LibraryFailure(attempted, log_hint);
+    Must(found >= 0, attempted, log_hint);
     if (found == 0)
         throw NotFound(attempted, ERR_NO_VOLUME_ID, "tavoctl lvm list shows what is there");
     return group;
@@ -81,192 +121,136 @@ LVMVG ReadGroup(const std::string &path, const std::string &attempted)
 void RefuseUsedGroup(const std::string &path, const std::string &attempted)
 {
     std::error_code none;
-    for (const auto &volume : std::filesystem::directory_iterator(path, none)) {
+    for (const auto &volume : std::filesystem::directory_iterator(path, none))
         if (const std::string use = UseOf(volume.path()); !use.empty())
-            throw Failure{.attempted = attempted, .reason = use, .hint = "free it first", .status = exit_busy};
-    }
+            throw BusyFailure(attempted, use, "free it first");
 }
 
-class LvmList : public Verb {
-  public:
-    static constexpr VerbInfo info = {"list", reads,
-                                      "Lists the physical volumes with their group and its volume, and where that is "
-                                      "mounted. While a disk is in standby nothing is read unless --wake is given.",
-                                      "tavoctl lvm list"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Flag("--wake", wake_, "read them although that wakes a disk");
-    }
-
-    int Run(const Call &call) override
-    {
-        RefuseToWakeAny(wake_, "list the physical volumes");
-        Table table({"device", "size", "group", "devices", "volume", "use", "uuid"});
+Action LvmList(Arguments &in)
+{
+    const auto wake = in.Flag("--wake", "read them although that wakes a disk");
+    return [=](Call &call) {
+        RefuseToWakeAny(*wake, "list the physical volumes");
+        std::vector<PvFacts> facts;
         for (const LVMPV &pv : PhysicalVolumes()) {
             char path[256];
             const bool has = *pv.szVg && LVMGetLVPath(pv.szPv, path, sizeof path) == 1;
-            uint64_t sectors = 0;
-            const bool sized = DiskSizeGet(pv.szPv, &sectors) == 1;
-            table.Add({DeviceName(pv.szPv), sized ? Cell(Bytes{sectors * 512}) : Cell(), Known(DeviceName(pv.szVg)),
-                       *pv.szVg ? Cell(int{pv.nPv}) : Cell(), has ? Cell(path) : Cell(),
-                       has ? Known(UseOf(path)) : Cell(), Known(pv.szUuid)});
+            facts.push_back({pv, has ? path : ""});
         }
-        call.Print(table);
-        return exit_done;
-    }
+        call.List(pv_columns, facts);
+    };
+}
 
-  private:
-    bool wake_ = false;
-};
-
-class LvmCreate : public Verb {
-  public:
-    static constexpr VerbInfo info = {"create", changes | destroys,
-                                      "Makes physical volumes of DEVICEs, a group of them, and the volume that fills "
-                                      "it. What is on them is lost; one that "
-                                      "is in use is refused.",
-                                      "tavoctl lvm create vg1 md2\n"
-                                      "tavoctl lvm create --yes --volume lv vg1 md2 md3"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.Text("GROUP", group_, group_help);
-        arguments.Texts("DEVICE", words_, "usually an array, md2 or /dev/md2", 1, DeviceNames);
-        arguments.Option("--volume", "NAME", volume_, "of the volume (lv)");
-    }
-
-    int Run(const Call &call) override
-    {
-        const std::string path = GroupPath(group_);
+Action LvmCreate(Arguments &in)
+{
+    const auto group = in.Text("GROUP", vg_kind, vg_help);
+    const auto words = in.Texts("DEVICE", device_kind, "usually an array, md2 or /dev/md2");
+    const auto volume = in.Option("--volume", "NAME", any_text, "of the volume (lv)");
+    return [=](Call &call) {
+        const std::string path = VgPath(*group);
         const std::string attempted = "make the volume group " + path;
         RefuseWithoutLvm(attempted);
-        const std::vector<std::string> paths = DevicePaths(words_);
-        LVMVG group;
-        if (LVMVgSBGet(path.c_str(), &group) == 1)
+        const std::vector<std::string> paths = DevicePaths(*words);
+        LVMVG present;
+        if (LVMVgSBGet(path.c_str(), &present) == 1)
             throw Failure{.attempted = attempted, .reason = "it is there already"};
         RefuseUsed(paths, attempted);
-        for (const LVMPV &pv : PhysicalVolumes()) {
-            for (const std::string &device : paths) {
+        for (const LVMPV &pv : PhysicalVolumes())
+            for (const std::string &device : paths)
                 if (*pv.szVg && device == pv.szPv)
-                    throw Failure{.attempted = attempted,
-                                  .reason = device + " belongs to " + pv.szVg,
-                                  .hint = "remove that first",
-                                  .status = exit_busy};
-            }
-        }
-        call.Confirm("Lose what is on " + Listed(paths) + "?");
-        if (LVMCreate(StringList(paths).Get(), path.c_str(), volume_.c_str(), nullptr, 0) != 0)
-            throw LibraryFailure(attempted, log_hint);
-        return exit_done;
-    }
+                    throw BusyFailure(attempted, device + " belongs to " + pv.szVg, "remove that first");
+        call.Change(path, "devices", {}, paths);
+        call.Change(path, "volume", {}, volume->value_or("lv"));
+        if (call.Proceed("Lose what is on " + Joined(paths, ", ") + "?"))
+            Must(LVMCreate(StringList(paths).Get(), path.c_str(), volume->value_or("lv").c_str(), nullptr, 0) == 0,
+                 attempted, log_hint);
+    };
+}
 
-  private:
-    std::string group_;
-    std::vector<std::string> words_;
-    std::string volume_ = "lv";
-};
-
-// A verb about a group that is there.
-class GroupVerb : public Verb {
-  public:
-    void Declare(Arguments &arguments) override { arguments.Text("GROUP", group_, group_help, GroupNames); }
-
-  protected:
-    std::string group_;
-};
-
-class LvmRemove : public GroupVerb {
-  public:
-    static constexpr VerbInfo info = {"remove", changes | destroys,
-                                      "Removes a group with its volumes and its physical volumes. What is on it is "
-                                      "lost; one that is in use is refused.",
-                                      "tavoctl lvm remove vg1"};
-
-    int Run(const Call &call) override
-    {
-        const std::string path = GroupPath(group_);
+Action LvmRemove(Arguments &in)
+{
+    const auto group = in.Text("GROUP", vg_kind, vg_help);
+    return [=](Call &call) {
+        const std::string path = VgPath(*group);
         const std::string attempted = "remove the volume group " + path;
-        RefuseWithoutLvm(attempted);
-        ReadGroup(path, attempted);
+        ReadVg(path, attempted);
         std::vector<std::string> devices;
-        for (const LVMPV &pv : PhysicalVolumes()) {
+        for (const LVMPV &pv : PhysicalVolumes())
             if (path == pv.szVg)
                 devices.emplace_back(pv.szPv);
-        }
         RefuseUsedGroup(path, attempted);
-        call.Confirm("Lose " + path + " and what is on it?");
-        if (LVMRemove(path.c_str(), "lv") != 0 || LVMVgRemove(path.c_str()) != 0)
-            throw LibraryFailure(attempted, log_hint);
-        for (const std::string &device : devices) {
-            if (LVMPvRemove(device.c_str()) != 0)
-                throw LibraryFailure("make " + device + " no physical volume any more", log_hint);
-        }
-        return exit_done;
-    }
-};
+        call.Change(path, "devices", devices, {});
+        if (!call.Proceed("Lose " + path + " and what is on it?"))
+            return;
+        Must(LVMRemove(path.c_str(), "lv") == 0 && LVMVgRemove(path.c_str()) == 0, attempted, log_hint);
+        for (const std::string &device : devices)
+            Must(LVMPvRemove(device.c_str()) == 0, "make " + device + " no physical volume any more", log_hint);
+    };
+}
 
-class LvmRename : public GroupVerb {
-  public:
-    static constexpr VerbInfo info = {"rename", changes, "Renames a group.", "tavoctl lvm rename vg1 vg2"};
-
-    void Declare(Arguments &arguments) override
-    {
-        GroupVerb::Declare(arguments);
-        arguments.Text("NAME", name_, "the new name; it begins with vg");
-    }
-
-    int Run(const Call &) override
-    {
-        const std::string path = GroupPath(group_);
+Action LvmRename(Arguments &in)
+{
+    const auto group = in.Text("GROUP", vg_kind, vg_help);
+    const auto new_name = in.Text("NAME", vg_kind, "the new name; it begins with vg");
+    return [=](Call &call) {
+        const std::string path = VgPath(*group);
+        const std::string name = VgName(*new_name);
         const std::string attempted = "rename the volume group " + path;
-        RefuseWithoutLvm(attempted);
-        const std::string name = DeviceName(GroupPath(name_));
-        ReadGroup(path, attempted);
-        if (LVMVgRename(path.c_str(), nullptr, name.c_str()) != 0)
-            throw LibraryFailure(attempted, log_hint);
-        return exit_done;
-    }
+        ReadVg(path, attempted);
+        call.Change(path, "name", DeviceName(path), name);
+        if (call.Proceed())
+            Must(LVMVgRename(path.c_str(), nullptr, name.c_str()) == 0, attempted, log_hint);
+    };
+}
 
-  private:
-    std::string name_;
-};
-
-class LvmExpand : public GroupVerb {
-  public:
-    static constexpr VerbInfo info = {
-        "expand", changes,
-        "Has the physical volumes of a group use the whole of their devices, after an array "
-        "has grown. The volume and its file system are not touched.",
-        "tavoctl lvm expand vg1"};
-
-    int Run(const Call &) override
-    {
-        const std::string path = GroupPath(group_);
+Action LvmExpand(Arguments &in)
+{
+    const auto group = in.Text("GROUP", vg_kind, vg_help);
+    return [=](Call &call) {
+        const std::string path = VgPath(*group);
         const std::string attempted = "expand the volume group " + path;
-        RefuseWithoutLvm(attempted);
-        const LVMVG group = ReadGroup(path, attempted);
+        const LVMVG found = ReadVg(path, attempted);
         const std::unique_ptr<LVMVGINFO, void (*)(LVMVGINFO *)> record(LVMVgInfoAlloc(), LVMVgInfoFree);
-        if (!record || LVMVgSB2Info(&group, record.get()) != 0)
-            throw LibraryFailure(attempted, log_hint);
+        Must(record && LVMVgSB2Info(&found, record.get()) == 0, attempted, log_hint);
         if (record->nPv == 0)
             throw Failure{.attempted = attempted, .reason = "it has no physical volumes"};
-        if (LVMPvExpand(record.get()) != 0)
-            throw LibraryFailure(attempted, log_hint);
-        return exit_done;
-    }
-};
+        call.Change(path, "size", {}, "the whole of its devices");
+        if (call.Proceed())
+            Must(LVMPvExpand(record.get()) == 0, attempted, log_hint);
+    };
+}
 
 }  // namespace
 
 void AddLvm(Program &program)
 {
     Family &lvm = program.Add("lvm", "Volume groups on the arrays");
-    lvm.Add<LvmList>();
-    lvm.Add<LvmCreate>();
-    lvm.Add<LvmRemove>();
-    lvm.Add<LvmRename>();
-    lvm.Add<LvmExpand>();
+    lvm.Add("list", reads, Answer::List(pv_columns), R"(Lists the physical volumes with their group and its volume, and
+where that is mounted. While a disk is in standby nothing is read unless --wake is given.
+
+tavoctl lvm list)",
+            LvmList);
+    lvm.Add("create", changes | destroys, Answer::Change(), R"(Makes physical volumes of DEVICEs, a group of them, and
+the volume that fills it. What is on them is lost; one that is in use is refused.
+
+tavoctl lvm create vg1 md2
+tavoctl lvm create --yes --volume lv vg1 md2 md3)",
+            LvmCreate);
+    lvm.Add("remove", changes | destroys, Answer::Change(),
+            R"(Removes a group with its volumes and its physical volumes.
+What is on it is lost; one that is in use is refused.
+
+tavoctl lvm remove vg1)",
+            LvmRemove);
+    lvm.Add("rename", changes, Answer::Change(), R"(Renames a group.
+
+tavoctl lvm rename vg1 vg2)",
+            LvmRename);
+    lvm.Add("expand", changes, Answer::Change(), R"(Has the physical volumes of a group use the whole of their devices,
+after an array has grown. The volume and its file system are not touched.
+
+tavoctl lvm expand vg1)",
+            LvmExpand);
 }
 
 }  // namespace tavoctl

@@ -1,9 +1,8 @@
-// tavoctl partition: the partition tables of the disks, read.
+// tavoctl partition: the partition tables of the disks.
 #include "families.h"
 #include "frame/failure.h"
 #include "frame/program.h"
-#include "frame/table.h"
-#include "storage/disk_verb.h"
+#include "storage/device.h"
 #include "storage/partitions.h"
 
 #include "tavo_lvm.h"
@@ -14,6 +13,31 @@
 namespace tavoctl {
 namespace {
 
+struct PartitionFacts {
+    std::string path;
+    std::optional<int64_t> start, sectors;
+    std::optional<Bytes> size;
+    std::optional<std::string> type, name;
+};
+
+constexpr Column<PartitionFacts> partition_columns[] = {
+    {"partition",
+     [](const PartitionFacts &p) {
+         return DeviceName(p.path);
+     }},
+    {"start", field<&PartitionFacts::start>, "", in_list, "sectors of 512 bytes"},
+    {"sectors", field<&PartitionFacts::sectors>, "of 512 bytes"},
+    {"size", field<&PartitionFacts::size>},
+    {"type", field<&PartitionFacts::type>, "hexadecimal"},
+    {"name", field<&PartitionFacts::name>, "of the type"},
+    {"use", [](const PartitionFacts &p) { return Maybe(UseOf(p.path)); }, "why it must not be overwritten"},
+};
+
+struct LayoutFacts {
+    TAVOPARTLAYOUT layout;
+    bool current;
+};
+
 std::string TypeText(uint32_t type)
 {
     char text[8];
@@ -21,164 +45,190 @@ std::string TypeText(uint32_t type)
     return text;
 }
 
-std::string TypeName(uint32_t type)
+constexpr Column<LayoutFacts> layout_columns[] = {
+    {"version",
+     [](const LayoutFacts &l) {
+         return l.layout.nVersion;
+     }},
+    {"raid",
+     [](const LayoutFacts &l) {
+         return l.layout.fRaid != 0;
+     }},
+    {"start_1",
+     [](const LayoutFacts &l) {
+         return static_cast<int64_t>(l.layout.place1.nStart);
+     }},
+    {"sectors_1",
+     [](const LayoutFacts &l) {
+         return static_cast<int64_t>(l.layout.place1.cSector);
+     }},
+    {"start_2",
+     [](const LayoutFacts &l) {
+         return static_cast<int64_t>(l.layout.place2.nStart);
+     }},
+    {"sectors_2",
+     [](const LayoutFacts &l) {
+         return static_cast<int64_t>(l.layout.place2.cSector);
+     }},
+    {"gap", [](const LayoutFacts &l) { return static_cast<int64_t>(l.layout.cGap); }, "", in_list, "sectors"},
+    {"types",
+     [](const LayoutFacts &l) {
+         std::vector<std::string> types;
+         for (const TAVOPARTPLACE &place : {l.layout.place1, l.layout.place2, l.layout.place3})
+             types.push_back(TypeText(place.nType));
+         return types;
+     },
+     "hexadecimal"},
+    {"current", field<&LayoutFacts::current>, "new disks get it"},
+};
+
+struct DiskLayout {
+    std::string disk;
+    int version;
+    bool raid;
+};
+
+constexpr Column<DiskLayout> disk_layout_columns[] = {
+    {"disk", field<&DiskLayout::disk>},
+    {"version", field<&DiskLayout::version>},
+    {"raid", field<&DiskLayout::raid>},
+};
+
+struct DiskTable {
+    std::string disk, table;
+};
+
+constexpr Column<DiskTable> disk_table_columns[] = {
+    {"disk", field<&DiskTable::disk>},
+    {"table", field<&DiskTable::table>, "none, mbr or gpt"},
+};
+
+std::string TypeNameOf(uint32_t type)
 {
-    for (const PARTTYPE *row = PartType; row->szName; ++row) {
+    for (const PARTTYPE *row = PartType; row->szName; ++row)
         if (row->nType == type)
             return row->szName;
-    }
     return "";
 }
 
-class PartitionList : public Verb {
-  public:
-    static constexpr VerbInfo info = {"list", reads,
-                                      "Lists the partitions of a disk, or of all: sectors are of 512 bytes. Of a disk "
-                                      "in standby only what the kernel "
-                                      "knows is shown, unless --wake is given.",
-                                      "tavoctl partition list\n"
-                                      "tavoctl partition list --json sda"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.OptionalText("DISK", disk_, disk_help, DiskNames);
-        arguments.Flag("--wake", wake_, wake_help);
+PartitionFacts DescribePartition(const std::string &disk, const std::string &path, bool asks)
+{
+    PartitionFacts partition = {path, {}, {}, {}, {}, {}};
+    int64_t start = 0;
+    uint32_t type = 0;
+    const int64_t sectors = asks ? RCPartitionConfigs(NumberOf(path), disk.c_str(), &start, &type) : -1;
+    if (sectors >= 0) {
+        partition.start = start;
+        partition.sectors = sectors;
+        partition.type = TypeText(type);
+        partition.name = TypeNameOf(type);
     }
+    uint64_t counted = 0;
+    if (DiskSizeGet(path.c_str(), &counted) == 1)
+        partition.size = Bytes{counted * 512};
+    return partition;
+}
 
-    int Run(const Call &call) override
-    {
-        Table table({"partition", "start", "sectors", "size", "type", "name", "use"});
-        for (const std::string &disk : disk_.empty() ? DiskPaths() : std::vector<std::string>{DiskPath(disk_)}) {
-            const bool asks = MayRead(disk, wake_);
-            for (const std::string &partition : PartitionsOf(disk))
-                table.Add(Row(disk, partition, asks));
+Action PartitionList(Arguments &in)
+{
+    const auto disk = in.OptionalText("DISK", disk_kind, disk_help);
+    const auto wake = in.Flag("--wake", wake_help);
+    return [=](Call &call) {
+        std::vector<PartitionFacts> partitions;
+        for (const std::string &path : *disk ? std::vector<std::string>{DiskPath(**disk)} : DiskPaths()) {
+            const bool asks = MayRead(path, *wake);
+            for (const std::string &partition : PartitionsOf(path))
+                partitions.push_back(DescribePartition(path, partition, asks));
         }
-        call.Print(table);
-        return exit_done;
-    }
+        call.List(partition_columns, partitions);
+    };
+}
 
-  private:
-    static std::vector<Cell> Row(const std::string &disk, const std::string &partition, bool asks)
-    {
-        int64_t start = 0;
-        uint32_t type = 0;
-        const int64_t sectors = asks ? RCPartitionConfigs(NumberOf(partition), disk.c_str(), &start, &type) : -1;
-        uint64_t counted = 0;
-        const bool sized = DiskSizeGet(partition.c_str(), &counted) == 1;
-        return {DeviceName(partition),
-                sectors < 0 ? Cell() : Cell(start),
-                sectors < 0 ? Cell() : Cell(sectors),
-                sized ? Cell(Bytes{counted * 512}) : Cell(),
-                sectors < 0 ? Cell() : Cell(TypeText(type)),
-                sectors < 0 ? Cell() : Cell(TypeName(type)),
-                Known(UseOf(partition))};
-    }
-
-    std::string disk_;
-    bool wake_ = false;
-};
-
-class PartitionLayout : public Verb {
-  public:
-    static constexpr VerbInfo info = {
-        "layout", reads,
-        "Shows which layout of the system a disk carries. Without DISK: every layout there has been, in sectors of 512 "
-        "bytes, and which one new disks get.",
-        "tavoctl partition layout sda\n"
-        "tavoctl partition layout"};
-
-    void Declare(Arguments &arguments) override
-    {
-        arguments.OptionalText("DISK", disk_, disk_help, DiskNames);
-        arguments.Flag("--wake", wake_, wake_help);
-    }
-
-    int Run(const Call &call) override
-    {
-        if (disk_.empty())
-            PrintAll(call);
-        else
-            PrintOne(call);
-        return exit_done;
-    }
-
-  private:
-    void PrintAll(const Call &call) const
-    {
-        RefuseToWakeAny(wake_, "find the layout of the system");
-        int current = 0;
-        if (PartitionLayoutGet(&current) != 0)
-            throw LibraryFailure("find the layout of the system");
-        const int raid = LVMIsSupport();
-        Table table({"version", "raid", "start_1", "sectors_1", "start_2", "sectors_2", "gap", "types", "current"});
-        for (const TAVOPARTLAYOUT &row : grgAllTavoPartLayout) {
-            std::vector<std::string> types;
-            for (const TAVOPARTPLACE &place : {row.place1, row.place2, row.place3})
-                types.push_back(TypeText(place.nType));
-            table.Add({int{row.nVersion}, row.fRaid != 0, int64_t{row.place1.nStart}, int64_t{row.place1.cSector},
-                       int64_t{row.place2.nStart}, int64_t{row.place2.cSector}, static_cast<int64_t>(row.cGap), types,
-                       row.nVersion == current && (row.fRaid != 0) == (raid == 1)});
+Action PartitionLayout(Arguments &in)
+{
+    const auto disk = in.OptionalText("DISK", disk_kind, disk_help);
+    const auto wake = in.Flag("--wake", wake_help);
+    return [=](Call &call) {
+        if (!*disk) {
+            const std::string attempted = "find the layout of the system";
+            RefuseToWakeAny(*wake, attempted);
+            int current = 0;
+            Must(PartitionLayoutGet(&current) == 0, attempted);
+            const bool raid = LVMIsSupport() == 1;
+            std::vector<LayoutFacts> layouts;
+            for (const TAVOPARTLAYOUT &row : grgAllTavoPartLayout)
+                layouts.push_back({row, row.nVersion == current && (row.fRaid != 0) == raid});
+            return call.List(layout_columns, layouts);
         }
-        call.Print(table);
-    }
-
-    void PrintOne(const Call &call) const
-    {
-        const std::string path = DiskPath(disk_);
+        const std::string path = DiskPath(**disk);
         const std::string attempted = "read the layout of " + path;
-        RefuseToWake(path, wake_, attempted);
-        for (const int raid : {1, 0}) {
+        RefuseToWake(path, *wake, attempted);
+        for (const bool raid : {true, false}) {
             int version = 0;
-            if (BlTAVOCheckPartitionLayout(path.c_str(), raid, &version) != 1)
-                continue;
-            Record record;
-            record.Add("disk", path);
-            record.Add("version", version);
-            record.Add("raid", raid == 1);
-            call.Print(record);
-            return;
+            if (BlTAVOCheckPartitionLayout(path.c_str(), raid, &version) == 1)
+                return call.One(disk_layout_columns, DiskLayout{path, version, raid});
         }
         throw Failure{.attempted = attempted,
                       .reason = "its partitions are none of the system's",
                       .hint = "tavoctl partition list shows them",
                       .status = exit_not_found};
-    }
+    };
+}
 
-    std::string disk_;
-    bool wake_ = false;
-};
-
-class PartitionTable : public WakingVerb {
-  public:
-    static constexpr VerbInfo info = {"table", reads, "Prints the kind of a disk's partition table: none, mbr or gpt.",
-                                      "tavoctl partition table sda"};
-
-    int Run(const Call &call) override
-    {
-        const std::string path = DiskPath(disk_);
+Action PartitionTable(Arguments &in)
+{
+    const auto disk = in.Text("DISK", disk_kind, disk_help);
+    const auto wake = in.Flag("--wake", wake_help);
+    return [=](Call &call) {
+        const std::string path = DiskPath(*disk);
         const std::string attempted = "read the partition table of " + path;
-        RefuseToWake(path, wake_, attempted);
+        RefuseToWake(path, *wake, attempted);
         int kind = 0;
-        if (PartitionTableTypeGet(path.c_str(), &kind) != 0)
-            throw LibraryFailure(attempted);
+        Must(PartitionTableTypeGet(path.c_str(), &kind) == 0, attempted);
         const char *text = kind == PARTITION_TABLE_GPT ? "gpt" : kind == PARTITION_TABLE_MBR ? "mbr" : "none";
-        Record record;
-        record.Add("disk", path);
-        record.Add("table", text);
-        call.PrintValue(text, record);
-        return exit_done;
-    }
-};
+        call.Value(text, disk_table_columns, DiskTable{path, text});
+    };
+}
 
 }  // namespace
 
 void AddPartition(Program &program)
 {
     Family &partition = program.Add("partition", "Partition tables of the disks");
-    partition.Add<PartitionList>();
-    partition.Add<PartitionLayout>();
-    AddPartitionChange(partition);
-    partition.Add<PartitionTable>();
+    partition.Add("list", reads, Answer::List(partition_columns),
+                  R"(Lists the partitions of a disk, or of all. Of a disk
+in standby only what the kernel knows is shown, unless --wake is given.
+
+tavoctl partition list
+tavoctl partition list --json sda)",
+                  PartitionList);
+    partition.Add("layout", reads, Answer::List(layout_columns).OrOne(disk_layout_columns), R"(Shows which layout of the
+system a disk carries. Without DISK: every layout there has been, in sectors of 512 bytes, and which one new disks get.
+
+tavoctl partition layout sda
+tavoctl partition layout)",
+                  PartitionLayout);
+    partition.Add("create", changes | destroys, Answer::Change(), R"(Makes the system's partitions on a disk. --system
+makes partitions 1 and 2, on an empty table, so that a data partition is gone too; --data partition 3, in a second call.
+What is on the disk is lost. A disk that is in use is refused.
+
+tavoctl partition create --system sdb
+tavoctl partition create --yes --data sdb
+tavoctl partition create --system --version 6 sdb)",
+                  PartitionMake);
+    partition.Add("clean", changes | destroys, Answer::Change(),
+                  R"(Empties entries of a disk's partition table and erases
+the RAID superblocks there. --data empties partitions 3 and up, --system all. --table only writes an empty table. What
+is in use is refused.
+
+tavoctl partition clean --data sdb
+tavoctl partition clean --yes --system sdb)",
+                  PartitionErase);
+    partition.Add("table", reads, Answer::One(disk_table_columns), R"(Prints the kind of a disk's partition table: none,
+mbr or gpt.
+
+tavoctl partition table sda)",
+                  PartitionTable);
 }
 
 }  // namespace tavoctl

@@ -1,8 +1,7 @@
 // tavoctl partition: making and cleaning what a disk of the system has.
 #include "frame/containers.h"
 #include "frame/failure.h"
-#include "frame/program.h"
-#include "storage/disk_verb.h"
+#include "storage/device.h"
 #include "storage/partitions.h"
 
 #include "tavo_lvm.h"
@@ -36,119 +35,70 @@ std::vector<std::string> PartitionsOf(const std::string &disk)
 namespace {
 
 // Either the system's two partitions or the data partition: in one go the one would undo the other.
-struct Choice {
-    bool system = false;
-    bool data = false;
+int FlagsOf(bool system, bool data, const std::string &attempted)
+{
+    if (system == data)
+        throw UsageFailure(attempted, system ? "--system would undo --data" : "--system or --data is required",
+                           "first --system, then --data");
+    return system ? PARTITION_SYSTEM : PARTITION_DATA;
+}
 
-    void Declare(Arguments &arguments, const char *of_system, const char *of_data)
-    {
-        arguments.Flag("--system", system, of_system);
-        arguments.Flag("--data", data, of_data);
-    }
-    int Flags(const std::string &attempted) const
-    {
-        if (system == data)
-            throw UsageFailure(attempted, system ? "--system would undo --data" : "say --system or --data",
-                               "first --system, then --data");
-        return system ? PARTITION_SYSTEM : PARTITION_DATA;
-    }
-};
+std::vector<std::string> DataPartitions(const std::string &disk)
+{
+    std::vector<std::string> partitions = PartitionsOf(disk);
+    std::erase_if(partitions, [](const std::string &partition) { return NumberOf(partition) < 3; });
+    return partitions;
+}
 
-class CreatePartitions : public DiskVerb {
-  public:
-    static constexpr VerbInfo info = {"create", changes | destroys,
-                                      "Makes the system's partitions on a disk: --system partitions 1 and 2, on an "
-                                      "empty table, so that a data partition "
-                                      "is gone too; --data partition 3, in a second call. What is on the disk is lost. "
-                                      "A disk that is in use is refused.",
-                                      "tavoctl partition create --system sdb\n"
-                                      "tavoctl partition create --yes --data sdb\n"
-                                      "tavoctl partition create --system --version 6 sdb"};
+}  // namespace
 
-    void Declare(Arguments &arguments) override
-    {
-        DiskVerb::Declare(arguments);
-        choice_.Declare(arguments, "partitions 1 and 2, on an empty table", "partition 3");
-        arguments.Number("--version", "VERSION", version_, "of the layout; 0: the one that the system carries (0)");
-    }
-
-    int Run(const Call &call) override
-    {
-        const std::string path = DiskPath(disk_);
+Action PartitionMake(Arguments &in)
+{
+    const auto disk = in.Text("DISK", disk_kind, disk_help);
+    const auto system = in.Flag("--system", "partitions 1 and 2, on an empty table");
+    const auto data = in.Flag("--data", "partition 3");
+    const auto version =
+        in.Number("--version", "VERSION", "of the layout; 0: the one that the system carries (0)", 0, 99);
+    return [=](Call &call) {
+        const std::string path = DiskPath(*disk);
         const std::string attempted = "make partitions on " + path;
-        const int flags = choice_.Flags(attempted);
-        if (TAVOPartitionLayoutIdxGet(version_, LVMIsSupport()) < 0)
-            throw UsageFailure(attempted, "there is no layout of version " + std::to_string(version_),
+        const int flags = FlagsOf(*system, *data, attempted);
+        int layout = static_cast<int>(version->value_or(0));
+        if (TAVOPartitionLayoutIdxGet(layout, LVMIsSupport()) < 0)
+            throw UsageFailure(attempted, "there is no layout of version " + std::to_string(layout),
                                "tavoctl partition layout shows them");
-        // Partition 3 is made behind the others, which may be in use.
+        // Partition 3 is made after the others, which may be in use.
         if (flags == PARTITION_SYSTEM)
             RefuseUsed({path}, attempted);
         else if (PartitionsOf(path).size() > 2)
             throw Failure{.attempted = attempted, .reason = "there is a data partition", .hint = "clean it first"};
-        call.Confirm(flags == PARTITION_SYSTEM ? "Lose all partitions of " + path + "?" : "Make " + path + "3?");
-        if (PartitionCreate(path.c_str(), flags, version_ ? &version_ : nullptr) != 0)
-            throw LibraryFailure(attempted, "look at the system log");
-        return exit_done;
-    }
+        call.Change(path, "partitions", PartitionsOf(path), flags == PARTITION_SYSTEM ? "1, 2" : "3");
+        if (call.Proceed(flags == PARTITION_SYSTEM ? "Lose all partitions of " + path + "?" : "Make " + path + "3?"))
+            Must(PartitionCreate(path.c_str(), flags, layout ? &layout : nullptr) == 0, attempted, log_hint);
+    };
+}
 
-  private:
-    Choice choice_;
-    int version_ = 0;
-};
-
-class CleanPartitions : public DiskVerb {
-  public:
-    static constexpr VerbInfo info = {"clean", changes | destroys,
-                                      "Empties entries of a disk's partition table and erases the RAID superblocks "
-                                      "there: --data partitions 3 and up, "
-                                      "--system all. --table only writes an empty table. What is in use is refused.",
-                                      "tavoctl partition clean --data sdb\n"
-                                      "tavoctl partition clean --yes --system sdb"};
-
-    void Declare(Arguments &arguments) override
-    {
-        DiskVerb::Declare(arguments);
-        choice_.Declare(arguments, "partitions 1 and 2, and with the table the others", "partitions 3 to 15");
-        arguments.Flag("--table", table_, "the table alone");
-    }
-
-    int Run(const Call &call) override
-    {
-        const std::string path = DiskPath(disk_);
-        const std::string attempted = "clean " + path;
-        if (table_ && (choice_.system || choice_.data))
-            throw UsageFailure(attempted, "--table goes alone");
-        const int flags = table_ ? 0 : choice_.Flags(attempted);
-        if (flags == PARTITION_DATA)
-            RefuseUsed(DataPartitions(path), attempted);
-        else
-            RefuseUsed({path}, attempted);
-        call.Confirm(flags == PARTITION_DATA ? "Lose the data partitions of " + path + "?"
-                                             : "Lose all partitions of " + path + "?");
-        const int result = table_ ? PartitionAddTable(path.c_str()) : PartitionClean(path.c_str(), flags);
-        if (result != 0)
-            throw LibraryFailure(attempted, "look at the system log");
-        return exit_done;
-    }
-
-  private:
-    static std::vector<std::string> DataPartitions(const std::string &disk)
-    {
-        std::vector<std::string> partitions = PartitionsOf(disk);
-        std::erase_if(partitions, [](const std::string &partition) { return NumberOf(partition) < 3; });
-        return partitions;
-    }
-
-    Choice choice_;
-    bool table_ = false;
-};
-
-}  // namespace
-
-void AddPartitionChange(Family &partition)
+Action PartitionErase(Arguments &in)
 {
-    partition.Add<CreatePartitions>();
-    partition.Add<CleanPartitions>();
+    const auto disk = in.Text("DISK", disk_kind, disk_help);
+    const auto system = in.Flag("--system", "partitions 1 and 2, and with the table the others");
+    const auto data = in.Flag("--data", "partitions 3 to 15");
+    const auto table = in.Flag("--table", "the table alone");
+    return [=](Call &call) {
+        const std::string path = DiskPath(*disk);
+        const std::string attempted = "clean " + path;
+        if (*table && (*system || *data))
+            throw UsageFailure(attempted, "--table excludes --system and --data");
+        const int flags = *table ? 0 : FlagsOf(*system, *data, attempted);
+        const bool some = flags == PARTITION_DATA;
+        RefuseUsed(some ? DataPartitions(path) : std::vector<std::string>{path}, attempted);
+        call.Change(path, "partitions", some ? DataPartitions(path) : PartitionsOf(path), {});
+        if (call.report.changes.empty())
+            call.Change(path, "partition table", {}, "empty");
+        if (call.Proceed(std::string("Lose ") + (some ? "the data partitions of " : "all partitions of ") + path + "?"))
+            Must((*table ? PartitionAddTable(path.c_str()) : PartitionClean(path.c_str(), flags)) == 0, attempted,
+                 log_hint);
+    };
 }
 
 }  // namespace tavoctl

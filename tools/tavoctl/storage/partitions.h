@@ -2,19 +2,20 @@
 #ifndef TAVOCTL_PARTITIONS_H
 #define TAVOCTL_PARTITIONS_H
 
+#include "frame/verb.h"
+
 #include <string>
 #include <vector>
 
 namespace tavoctl {
-
-class Family;
 
 int NumberOf(const std::string &partition);  // 3 of "/dev/sda3"
 
 // In the order of the kernel's list.
 std::vector<std::string> PartitionsOf(const std::string &disk);
 
-void AddPartitionChange(Family &partition);
+Action PartitionMake(Arguments &in);
+Action PartitionErase(Arguments &in);
 
 }  // namespace tavoctl
 
