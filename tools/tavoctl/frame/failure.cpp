@@ -54,6 +54,21 @@ int StatusOf(int code)
     }
 }
 
+// What the library needs at a time. Without descriptors no lock can be had, even if nobody holds it.
+bool HasDescriptors()
+{
+    constexpr std::size_t needed = 16;
+    std::vector<int> probes;
+    while (probes.size() < needed)
+        if (probes.emplace_back(::open("/dev/null", O_RDONLY | O_CLOEXEC)) < 0)
+            break;
+    const bool enough = probes.back() >= 0 || (errno != EMFILE && errno != ENFILE);
+    for (const int fd : probes)
+        if (fd >= 0)
+            ::close(fd);
+    return enough;
+}
+
 }  // namespace
 
 int Failure::Status() const
@@ -144,12 +159,8 @@ Failure BusyFailure(std::string attempted, std::string reason, std::string hint)
 
 Failure WithPermissions(Failure failure)
 {
-    // Without a descriptor no lock can be had, whoever holds it.
-    const int probe = ::open("/dev/null", O_RDONLY | O_CLOEXEC);
-    if (probe >= 0)
-        ::close(probe);
-    if (failure.code && probe < 0 && (errno == EMFILE || errno == ENFILE)) {
-        failure.reason = "no file descriptor is left";
+    if (failure.code && !HasDescriptors()) {
+        failure.reason = "too few file descriptors are left";
         failure.hint = "raise the limit, ulimit -n";
         failure.status = exit_failed;
         return failure;

@@ -93,7 +93,8 @@ std::string VerbEntry::Summary() const
 {
     // The full stop of "802.3ad" ends nothing.
     const std::size_t stop = std::min(purpose.find(". "), purpose.find(".\n"));
-    const std::string sentence = purpose.substr(0, stop);
+    std::string sentence = purpose.substr(0, stop);
+    std::replace(sentence.begin(), sentence.end(), '\n', ' ');
     return sentence.ends_with('.') ? sentence.substr(0, sentence.size() - 1) : sentence;
 }
 
