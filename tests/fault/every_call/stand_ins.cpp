@@ -81,7 +81,7 @@ extern "C" int execve(const char *path, char *const *arguments, char *const *env
 
 extern "C" int quotactl(int command, const char *, int, caddr_t data) noexcept
 {
-    if (every_call::WasFailed(::syscall(SYS_quotactl, -1, nullptr, 0, nullptr)))
+    if (every_call::WasFailed(::syscall(SYS_quotactl, -1, "", 0, nullptr)))
         return -1;
     if (command == QCMD(Q_GETQUOTA, USRQUOTA))
         std::memset(data, 0, sizeof(dqblk));
