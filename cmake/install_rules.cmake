@@ -34,3 +34,7 @@ cmake_path(RELATIVE_PATH CMAKE_INSTALL_PREFIX BASE_DIRECTORY ${CMAKE_INSTALL_PRE
     OUTPUT_VARIABLE TAVO_PC_PREFIX)
 configure_file(${PROJECT_SOURCE_DIR}/cmake/tavosdk.pc.in ${PROJECT_BINARY_DIR}/tavosdk.pc @ONLY)
 install(FILES ${PROJECT_BINARY_DIR}/tavosdk.pc DESTINATION ${TAVO_PC_FOLDER} COMPONENT development)
+
+set(pages ${PROJECT_SOURCE_DIR}/docs/man)
+install(FILES ${pages}/findhostd.8 ${pages}/tavo-sfdisk.8 DESTINATION ${CMAKE_INSTALL_MANDIR}/man8 COMPONENT appliance)
+install(FILES ${pages}/tavoinfo.conf.5 DESTINATION ${CMAKE_INSTALL_MANDIR}/man5 COMPONENT tavoctl)
