@@ -42,6 +42,22 @@ class Name:
     group: list = dataclasses.field(default_factory=list)  # the names that one comment describes
     family: "Family" = None
 
+    def declaration(self, width=72):
+        """The declaration in lines of that width."""
+        text = self.prototype + ";"
+        if len(text) <= width or "(" not in text:
+            return [text]
+        head, _, rest = text.partition("(")
+        lines, current = [], head + "("
+        for part in rest.split(", "):
+            part += "" if part.endswith(";") else ","
+            if len(current) + len(part) > width:
+                lines.append(current.rstrip())
+                current = "    " + part + " "
+            else:
+                current += part + " "
+        return lines + [current.rstrip()]
+
 
 @dataclasses.dataclass
 class Family:

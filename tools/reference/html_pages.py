@@ -21,6 +21,7 @@ pre, code { font: 14px/1.45 ui-monospace, monospace; } pre { margin: .5rem 0; ov
 pre.synopsis { background: var(--soft); padding: .7rem 1rem; border-radius: 6px; }
 p { margin: .5rem 0; } table { border-collapse: collapse; } td, th { padding: .2rem .8rem .2rem 0; text-align: left;
       vertical-align: top; }
+.part { margin-top: 3rem; font-size: 1.4rem; font-weight: 600; color: var(--link); }
 .section { margin-top: 3rem; padding: .4rem 1rem; background: var(--soft); border-left: 3px solid var(--link); }
 @media (max-width: 50rem) { body { display: block; } nav { position: static; height: auto; border: 0; } }
 """
@@ -77,13 +78,22 @@ def _runs_of(lines):
 def _entry(group, page, link):
     first = group[0]
     heading = ", ".join(f'<span id="{entry.name}">{entry.name}</span>' for entry in group)
-    synopsis = "\n".join(html.escape(entry.prototype, quote=False) + ";" for entry in group)
+    synopsis = "\n".join(html.escape(line, quote=False) for entry in group for line in entry.declaration())
     out = [f"<h2>{heading}</h2><pre class=synopsis>{synopsis}</pre>", _prose(first.comment.text, link, first.name)]
     for label, items in (("Files", page.files if first.comment.fixed.get("Files") else []),
                          ("Programs", page.runs), ("Locks", page.locks)):
         if items:
             out.append(f"<h3>{label}</h3><p>{', '.join(link(item) for item in items)}</p>")
     return "".join(out)
+
+
+def _section(text, link):
+    """A word or two are a heading; more is a note about what follows."""
+    if not text:
+        return ""
+    if len(text) < 40 and "\n" not in text:
+        return f'<p class="part">{html.escape(text.rstrip("."))}</p>'
+    return f'<div class="section">{_prose(text, link)}</div>'
 
 
 def _constants(family):
@@ -120,13 +130,13 @@ def write(folder, version):
         f"<h2>All names</h2><p>{listed}</p>"), families))
 
     for family in families:
-        body = [f"<h1>{link(family.title)}</h1><pre class=synopsis>#include &lt;{family.header}&gt;</pre>",
+        body = [f"<h1>{link(family.title.rstrip('.'))}</h1><pre class=synopsis>#include &lt;{family.header}&gt;</pre>",
                 _prose(family.intro.text, link)]
         done, section = set(), None
         for entry in family.names:
             if entry.section.text != section:
                 section = entry.section.text
-                body.append(f'<div class="section">{_prose(section, link)}</div>' if section else "")
+                body.append(_section(section, link))
             if entry.name not in done:
                 group = [other for other in family.names if other.name in entry.group] or [entry]
                 done |= {other.name for other in group}

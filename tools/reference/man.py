@@ -37,29 +37,13 @@ def _paragraphs(text):
     return out
 
 
-def _prototype(entry, width=72):
-    text = entry.prototype + ";"
-    if len(text) <= width or "(" not in text:
-        return [text]
-    head, _, rest = text.partition("(")
-    lines, current = [], head + "("
-    for part in rest.split(", "):
-        part += "" if part.endswith(";") else ","
-        if len(current) + len(part) > width:
-            lines.append(current.rstrip())
-            current = "    " + part + " "
-        else:
-            current += part + " "
-    return lines + [current.rstrip()]
-
-
 def manual_page(entry, page, version):
     out = [f'.TH {entry.name} 3 "" "tavosdk {version}" "The appliance\\(aqs library"', ".nh", ".ad l",
            ".SH NAME", f"{entry.name} \\- {_escape(page.summary)}",
            ".SH SYNOPSIS", ".nf", f".B #include <{entry.family.header}>", ".PP"]
     group = [other for other in entry.family.names if other.name in entry.group] or [entry]
     for other in group:
-        out += [f"\\fB{_escape(line)}\\fR" for line in _prototype(other)]
+        out += [f"\\fB{_escape(line)}\\fR" for line in other.declaration()]
     out += [".fi", ".PP", "Link with \\fI\\-ltavosdk\\fR."]
     out += [".SH DESCRIPTION"] + _paragraphs(pages.without_tables(page.description))
     if entry.kind == "function":
