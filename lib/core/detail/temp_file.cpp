@@ -114,9 +114,18 @@ bool TempFile::CreateBeside(const std::string &target)
         fd_ = OpenFd(path_.c_str(), O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
         if (!fd_ && errno == EEXIST)
             continue;
-        // Between the two calls another process may have found it dead.
-        if (!fd_ || (LockTemp(fd_.Get()) && IsNamed(fd_.Get(), AT_FDCWD, path_.c_str())))
+        if (!fd_)
             break;
+        // Between the two calls another process may have found it dead.
+        if (LockTemp(fd_.Get())) {
+            errno = 0;
+            if (IsNamed(fd_.Get(), AT_FDCWD, path_.c_str()))
+                break;
+            if (errno != 0 && errno != ENOENT) {
+                Remove();
+                break;
+            }
+        }
         fd_.Reset();
     }
     if (!fd_)

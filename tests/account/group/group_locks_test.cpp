@@ -25,7 +25,7 @@ std::vector<std::string> *recorded = nullptr;
 
 }  // namespace
 
-// Takes the place of flock: notes which lock file it was.
+// Takes the place of flock: notes which lock file it was. Temporary files are locked too, while they live.
 extern "C" int flock(int fd, int operation) noexcept
 {
     static const auto real = reinterpret_cast<int (*)(int, int)>(::dlsym(RTLD_NEXT, "flock"));
@@ -33,7 +33,11 @@ extern "C" int flock(int fd, int operation) noexcept
     if (recorded && result == 0) {
         std::error_code ignored;
         const auto path = std::filesystem::read_symlink("/proc/self/fd/" + std::to_string(fd), ignored);
-        recorded->push_back((operation & LOCK_UN ? "-" : operation & LOCK_SH ? "~" : "+") + path.filename().string());
+        if (path.parent_path() == "/tmp/lock")
+            recorded->push_back((operation & LOCK_UN   ? "-"
+                                 : operation & LOCK_SH ? "~"
+                                                       : "+") +
+                                path.filename().string());
     }
     return result;
 }
