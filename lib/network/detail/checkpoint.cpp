@@ -4,6 +4,7 @@
 #include "core/detail/keep_fault.h"
 #include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
+#include "core/detail/open_file.h"
 #include "core/detail/process_list.h"
 #include "core/detail/run_command.h"
 #include "core/detail/text_fields.h"

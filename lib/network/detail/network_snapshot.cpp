@@ -13,7 +13,6 @@
 
 #include <algorithm>
 #include <charconv>
-#include <ranges>
 
 #include <net/if.h>
 #include <net/route.h>
@@ -131,9 +130,10 @@ void Checkpoint::AddMtu(const std::string &interface)
 void Checkpoint::AddGateway()
 {
     AddCommand("/sbin/route delete default > /dev/null 2>&1", true);
-    for (const Route &route : std::views::reverse(LiveRoutes())) {
-        if (route.IsDefault())
-            steps_.push_back({UndoStep::route, RouteCommand(route), RouteText(route), {}});
+    const std::vector<Route> routes = LiveRoutes();
+    for (auto route = routes.rbegin(); route != routes.rend(); ++route) {
+        if (route->IsDefault())
+            steps_.push_back({UndoStep::route, RouteCommand(*route), RouteText(*route), {}});
     }
 }
 
@@ -146,9 +146,10 @@ void Checkpoint::AddRoutes(const std::vector<Route> &routes, const std::string &
     };
     // Networks on the link first, a router may be on one. From the last one on: a new route goes before its equals.
     for (const uint32_t through_router : {0u, uint32_t{RTF_GATEWAY}}) {
-        for (const Route &route : std::views::reverse(routes)) {
-            if (route.interface == interface && (route.flags & RTF_GATEWAY) == through_router && !is_own_network(route))
-                steps_.push_back({UndoStep::route, RouteCommand(route), RouteText(route), {}});
+        for (auto route = routes.rbegin(); route != routes.rend(); ++route) {
+            if (route->interface == interface && (route->flags & RTF_GATEWAY) == through_router &&
+                !is_own_network(*route))
+                steps_.push_back({UndoStep::route, RouteCommand(*route), RouteText(*route), {}});
         }
     }
 }
