@@ -286,7 +286,18 @@ bool CanFail(const SystemCall &call)
 #endif
     case SYS_umask:
     case SYS_sync:
-    case SYS_wait4:         // of a child that is there
+    case SYS_wait4:  // of a child that is there
+#ifdef __SANITIZE_ADDRESS__
+        // The sanitizer ends the program when it gets no memory, or when it cannot run its own helpers.
+#ifdef SYS_mmap2
+    case SYS_mmap2:
+#else
+    case SYS_mmap:
+#endif
+    case SYS_munmap:
+    case SYS_mprotect:
+    case SYS_madvise:
+#endif
     case SYS_rt_sigaction:  // of valid arguments, which the C library passes
     case SYS_rt_sigprocmask:
         return false;

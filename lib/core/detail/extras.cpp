@@ -40,11 +40,11 @@ bool FileBeside(char (&path)[PATH_MAX]) noexcept
 
 void *OpenExtras() noexcept
 {
-    constexpr int kMode = RTLD_NOW | RTLD_LOCAL;
+    constexpr int mode = RTLD_NOW | RTLD_LOCAL;
     char beside[PATH_MAX];
-    void *handle = FileBeside(beside) ? ::dlopen(beside, kMode) : nullptr;
+    void *handle = FileBeside(beside) ? ::dlopen(beside, mode) : nullptr;
     // A program that holds the library itself says in its run path where an installation has it.
-    return handle ? handle : ::dlopen(kExtrasFile, kMode);
+    return handle ? handle : ::dlopen(kExtrasFile, mode);
 }
 
 const Extras *FindExtras(const char *&reason) noexcept
