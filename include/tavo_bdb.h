@@ -63,14 +63,14 @@ typedef struct TAVOBDB {
  * fBtreeInfo 1 passes the database a zeroed parameter block, 0 none; the files are the same.
  * New files, and for root every file that is opened, get mode 0666. A symbolic link is not followed.
  * The stores of the account families (TAVO_USER_DB_..., TAVO_GROUP_DB_...) belong to root: mode 0644, those of password
- * hashes 0600. A file there that is not root's, has a second name or grants more than that mode is no store. Only root
+ * hashes 0600. A file there that is not root's, has a second name or grants more than that mode is not a store. Only root
  * creates or clears them; another program may open for reading what its rights let it read.
  * Returns a handle for TAVOBDbClose, or NULL with
  *   ERR_BAD_PARAMETERS    szPath is NULL or empty
  *   ERR_OUT_OF_MEMORY     no memory
  *   ERR_ACCESS_DENIED     no permission
  *   ERR_FILE_NOT_FOUND    no such file, and O_CREAT was not given
- *   ERR_DB_OPEN           the file is no store: it has been removed, so that the next open with O_CREAT makes a new one.
+ *   ERR_DB_OPEN           the file is not a store: it has been removed; the next open with O_CREAT creates one.
  *                         A folder with something in it is renamed to "NAME.aside.XXXXXX" instead
  *   ERR_NOT_ENOUGH_SPACE  the disk is full
  *   ERR_OPEN_FAILED       anything else */

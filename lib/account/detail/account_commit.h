@@ -1,7 +1,7 @@
 // Replaces everything that one change touches together: the text files of users and groups, and the neighbours' files in
 // which names stand. Each new file is written and synced beside the old one; then the marker, which names them all and
 // what follows, is made durable, they are moved into place one by one, and the marker goes. A death before the marker leaves
-// the old files, one after it is made good by whoever comes next: never some of each.
+// the old files, one after it is finished by the next caller: never some of each.
 // A file that would become what it is stays. Where only one changes, moving it into place is all or nothing by itself.
 #ifndef TAVO_ACCOUNT_DETAIL_ACCOUNT_COMMIT_H
 #define TAVO_ACCOUNT_DETAIL_ACCOUNT_COMMIT_H

@@ -88,7 +88,7 @@ unsigned SequenceFlag(int32_t cursor_type)
     }
 }
 
-// A file that is no store goes, so that the next open can make a new one. Only root clears the names of the families.
+// Removes a file that is not a store so that the next open can create one. Only root clears the names of the families.
 int RemoveForeign(const char *path, bool is_ours)
 {
     if (is_ours && ::geteuid() != 0)

@@ -19,14 +19,14 @@ namespace tavo {
 class Btree : public TAVOBDB, public StoreView {
   public:
     // `mode` is given to a file that is created, and to any file when we are root; 0 leaves an existing file's alone. The
-    // stores of the families have modes of their own, and what is not root's alone there is no store.
+    // stores of the families have modes of their own, and what is not root's alone is not a store there.
     struct Options {
         int flags = 0;
         bool info = true;
         mode_t mode = 0;
     };
 
-    // 0 and a handle, or an error code. A file that is no store is gone after ERR_DB_OPEN.
+    // 0 and a handle, or an error code. A file that is not a store is gone after ERR_DB_OPEN.
     static int Open(const char *path, const Options &options, std::unique_ptr<Btree> &out);
 
     // A new store in a folder that nobody else can enter. The file's mode is 0600.
