@@ -15,10 +15,13 @@ Token FirstToken(std::string_view line, std::string_view delimiters)
     const size_t begin = line.find_first_not_of(delimiters);
     if (begin == line.npos)
         return {};
-    const size_t end = line.find_first_of(delimiters, begin);
+    line.remove_prefix(begin);
+    const size_t end = line.find_first_of(delimiters);
     if (end == line.npos)
-        return {line.substr(begin), {}};
-    return {line.substr(begin, end - begin), line.substr(end + 1)};
+        return {line, {}};
+    const std::string_view token = line.substr(0, end);
+    line.remove_prefix(end + 1);
+    return {token, line};
 }
 
 }  // namespace

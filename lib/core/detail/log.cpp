@@ -39,7 +39,7 @@ class LogLine final : public TextWriter {
             else if (IsControl(static_cast<unsigned char>(text[at])))
                 Escape(text[at]);
             else
-                Literal(text.substr(at, 1));
+                Literal({&text[at], 1});
         }
     }
 

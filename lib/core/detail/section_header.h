@@ -14,11 +14,12 @@ constexpr bool IsSectionHeader(std::string_view line)
     return line.starts_with('[') && line[last] == ']';
 }
 
-// No white space may stand inside the brackets, and nothing else behind them.
+// There must be no white space inside the brackets, and nothing else after them.
 constexpr bool HeadsSection(std::string_view line, std::string_view name)
 {
-    return line.starts_with('[') && line.substr(1).starts_with(name) && line.substr(1 + name.size()).starts_with(']') &&
-           line.find_first_not_of(kWhiteSpace, name.size() + 2) == line.npos;
+    const size_t closing = name.size() + 1;
+    return line.size() > closing && line[0] == '[' && std::string_view(&line[1], name.size()) == name &&
+           line[closing] == ']' && line.find_first_not_of(kWhiteSpace, closing + 1) == line.npos;
 }
 
 // Whether a header with this name is found again.

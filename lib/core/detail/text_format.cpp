@@ -50,11 +50,8 @@ void WriteNumber(TextWriter &out, const Conversion &how, const TextArg &arg)
         text[0] = static_cast<char>(arg.Bits());
         out.Argument({text, 1});
         return;
-    case 'x':
-        length = std::snprintf(text, sizeof text, how.zeros ? "%0*llx" : "%*llx", how.width, arg.Bits());
-        break;
     default:
-        length = std::snprintf(text, sizeof text, "%#llx", arg.Bits());
+        length = std::snprintf(text, sizeof text, how.zeros ? "%0*llx" : "%*llx", how.width, arg.Bits());
         break;
     }
     out.Literal({text, static_cast<size_t>(length)});
@@ -71,7 +68,7 @@ void FormatText(TextWriter &out, const char *format, std::initializer_list<TextA
         format = percent + how.spelled.size();
         if (how.letter == '%')
             out.Literal("%");
-        else if (how.letter == 0 || !std::strchr("sdiuxXcp", how.letter) || next == args.end())
+        else if (how.letter == 0 || !std::strchr("sdiuxXc", how.letter) || next == args.end())
             out.Literal(how.spelled);
         else if (const TextArg &arg = *next++; arg.IsText())
             out.Argument(arg.Text());

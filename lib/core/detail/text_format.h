@@ -58,7 +58,7 @@ class TextWriter {
     ~TextWriter() = default;
 };
 
-// Understands %s, %c, %d, %i, %u, %x, %X and %p with a zero flag, a width and the length modifiers (which the typed
+// Understands %s, %c, %d, %i, %u, %x and %X with a zero flag, a width and the length modifiers (which the typed
 // arguments make superfluous), and %%. A conversion without an argument is written as it stands.
 void FormatText(TextWriter &out, const char *format, std::initializer_list<TextArg> args);
 

@@ -18,8 +18,8 @@ static_assert(std::is_sorted(std::begin(kModules), std::end(kModules),
 
 constexpr std::string_view Stem(std::string_view path)
 {
-    const std::string_view name = path.substr(path.rfind('/') + 1);
-    return name.substr(0, name.rfind('.'));
+    path.remove_prefix(path.rfind('/') + 1);
+    return path.substr(0, path.rfind('.'));
 }
 
 }  // namespace

@@ -16,10 +16,13 @@ std::string_view Trimmed(std::string_view text)
     const size_t first = text.find_first_not_of(kWhiteSpace);
     if (first == text.npos)
         return text.substr(0, 0);
-    text = text.substr(first, text.find_last_not_of(kWhiteSpace) - first + 1);
+    text = text.substr(0, text.find_last_not_of(kWhiteSpace) + 1);
+    text.remove_prefix(first);
     // A quote alone is text.
-    if (text.size() > 1 && text.front() == '"' && text.back() == '"')
-        text = text.substr(1, text.size() - 2);
+    if (text.size() > 1 && text.front() == '"' && text.back() == '"') {
+        text.remove_prefix(1);
+        text.remove_suffix(1);
+    }
     return text;
 }
 

@@ -75,7 +75,9 @@ std::optional<SlashPair> SplitAtSlash(std::string_view text) noexcept
     const size_t slash = text.find('/');
     if (slash == std::string_view::npos)
         return std::nullopt;
-    return SlashPair{text.substr(0, slash), text.substr(slash + 1)};
+    const std::string_view before = text.substr(0, slash);
+    text.remove_prefix(slash + 1);
+    return SlashPair{before, text};
 }
 
 }  // namespace tavo

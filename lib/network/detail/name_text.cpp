@@ -48,8 +48,10 @@ bool IsAtomText(std::string_view text) noexcept
 bool IsMailboxText(std::string_view text) noexcept
 {
     const size_t at = text.find('@');
-    return at != std::string_view::npos && AllBetweenDots(text.substr(0, at), IsAtomText) &&
-           IsDomainText(text.substr(at + 1));
+    if (at == text.npos || !AllBetweenDots(text.substr(0, at), IsAtomText))
+        return false;
+    text.remove_prefix(at + 1);
+    return IsDomainText(text);
 }
 
 }  // namespace tavo

@@ -5,7 +5,7 @@
 #include "storage/detail/strict_number.h"
 
 #include <array>
-#include <string>
+#include <cstdio>
 
 namespace tavo {
 namespace {
@@ -44,7 +44,7 @@ std::optional<LVMPV> ParsePvLine(std::string_view line)
     LVMPV pv = {};
     CopyBounded(pv.szPv, fields[0]);
     if (fields[1].starts_with("vg"))
-        CopyBounded(pv.szVg, std::string("/dev/").append(fields[1]));
+        std::snprintf(pv.szVg, sizeof pv.szVg, "/dev/%.*s", static_cast<int>(fields[1].size()), fields[1].data());
     CopyBounded(pv.szUuid, fields[2]);
     pv.nPv = StrictNumber<int32_t>(WithoutTail(fields[3])).value_or(0);
     return pv;
