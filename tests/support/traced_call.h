@@ -6,7 +6,7 @@
 //         ... what the next program finds ...
 //
 //     for (const test::SystemCall &call : test::DistinctCalls(test::SystemCallsOf(work)))
-//         const test::Ending ending = test::FailsAtCall(call.index, EIO, work);
+//         const test::Ending ending = test::FailsAtCall(call, EIO, work);
 #ifndef TESTS_SUPPORT_TRACED_CALL_H
 #define TESTS_SUPPORT_TRACED_CALL_H
 
@@ -53,9 +53,10 @@ void MarkCalls();
 std::vector<SystemCall> DistinctCalls(const std::vector<SystemCall> &calls);
 bool CanFail(const SystemCall &call);
 
-// The Nth system call is not made and gives -1 with `error`; only close is made, as a kernel does that reports an error of
-// what was written before. Everything after it is as usual.
-Ending FailsAtCall(int n, int error, const std::function<void()> &work, int seconds = 20);
+// This system call of the work is not made and gives -1 with `error`; only close is made, as a kernel does that reports an
+// error of what was written before. Everything after it is as usual. A signal may come elsewhere than it did when the calls
+// were counted: it is then the next call of that kind.
+Ending FailsAtCall(const SystemCall &which, int error, const std::function<void()> &work, int seconds = 20);
 
 // The child is killed before it makes its Nth system call. False when it came to its end before that.
 bool DiesAtCall(int n, const std::function<void()> &work);

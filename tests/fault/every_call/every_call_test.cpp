@@ -327,14 +327,7 @@ TEST_P(EveryCall, EachSystemCallFails)
                              std::to_string(calls.back().index) + ", " + chosen[i].Name() + ", fails with " +
                              ::strerrorname_np(error));
                 *report_ = {};
-                test::Ending ending = test::FailsAtCall(chosen[i].index, error, work);
-                if (WIFSIGNALED(ending.status) && WTERMSIG(ending.status) == SIGSEGV) {
-                    // When the end of a program meets the tracer's stop, a caller that waits has been seen to die, at
-                    // random. What the error itself does, it does again.
-                    files.Restore();
-                    *report_ = {};
-                    ending = test::FailsAtCall(chosen[i].index, error, work);
-                }
+                const test::Ending ending = test::FailsAtCall(chosen[i], error, work);
                 const Report got = *report_;
                 ++tried;
                 const bool database = IsOnStack(ending.stack, "libdb");

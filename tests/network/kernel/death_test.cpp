@@ -147,7 +147,7 @@ class Death : public testing::Test {
                 for (const int error : {EIO, ENOSPC}) {
                     back();
                     EXPECT_EQ(State(), before);
-                    const test::Ending ending = test::FailsAtCall(calls[i].index, error, work);
+                    const test::Ending ending = test::FailsAtCall(calls[i], error, work);
                     EXPECT_FALSE(ending.hung) << calls[i].Name();
                     const int status = WIFEXITED(ending.status) ? WEXITSTATUS(ending.status) : 128;
                     EXPECT_LE(status, 2) << calls[i].Name() << " " << ending;
