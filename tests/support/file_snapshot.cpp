@@ -36,13 +36,14 @@ std::string ContentOf(const std::string &path, const struct stat &facts)
     return {};
 }
 
-void AddFolder(const std::string &folder, const KeptFiles &known, KeptFiles &files)
+// What is mounted in a folder is another's: in a tree that was cloned into /tmp, the build with this program.
+void AddFolder(const std::string &folder, dev_t device, const KeptFiles &known, KeptFiles &files)
 {
     std::error_code none;
     for (const auto &entry : std::filesystem::directory_iterator(folder, none)) {
         const std::string path = entry.path();
         KeptFile file = {};
-        if (::lstat(path.c_str(), &file.facts) != 0)
+        if (::lstat(path.c_str(), &file.facts) != 0 || file.facts.st_dev != device)
             continue;
         const auto before = known.find(path);
         file.content = before != known.end() && Untouched(before->second.facts, file.facts)
@@ -51,7 +52,7 @@ void AddFolder(const std::string &folder, const KeptFiles &known, KeptFiles &fil
         const bool is_folder = S_ISDIR(file.facts.st_mode);
         files[path] = std::move(file);
         if (is_folder)
-            AddFolder(path, known, files);
+            AddFolder(path, device, known, files);
     }
 }
 
@@ -87,8 +88,11 @@ FileSnapshot::FileSnapshot(std::vector<std::string> folders) : folders_(std::mov
 KeptFiles FileSnapshot::Now() const
 {
     KeptFiles files;
-    for (const std::string &folder : folders_)
-        AddFolder(folder, files_, files);
+    struct stat facts;
+    for (const std::string &folder : folders_) {
+        if (::stat(folder.c_str(), &facts) == 0)
+            AddFolder(folder, facts.st_dev, files_, files);
+    }
     return files;
 }
 
