@@ -2,26 +2,20 @@
 #include "families.h"
 #include "frame/containers.h"
 #include "frame/failure.h"
+#include "frame/folder_names.h"
 #include "frame/program.h"
 #include "network/net_verbs.h"
 
 #include "tavo_net.h"
 
 #include <algorithm>
-#include <filesystem>
 
 namespace tavoctl {
 
 std::vector<std::string> InterfaceNames()
 {
-    std::vector<std::string> names;
-    std::error_code ignored;
-    for (const auto &entry : std::filesystem::directory_iterator("/sys/class/net", ignored)) {
-        const std::string name = entry.path().filename();
-        if (name != "lo" && name != "bonding_masters")
-            names.push_back(name);
-    }
-    std::sort(names.begin(), names.end());
+    std::vector<std::string> names = FolderNames("/sys/class/net");
+    std::erase_if(names, [](const std::string &name) { return name == "lo" || name == "bonding_masters"; });
     return names;
 }
 

@@ -1,5 +1,6 @@
 // Who uses a block device: a mount, swap, an array, a volume, or somebody who has it for himself.
 #include "frame/failure.h"
+#include "frame/folder_names.h"
 #include "storage/device.h"
 
 #include "tavo_error.h"
@@ -46,10 +47,9 @@ std::string MountOf(dev_t number)
 
 std::string HolderOf(const fs::path &device)
 {
-    std::error_code none;
-    for (const auto &holder : fs::directory_iterator(device / "holders", none)) {
-        const std::string name = holder.path().filename();
-        const auto mapped = KernelText(holder.path() / "dm/name");
+    const fs::path holders = device / "holders";
+    for (const std::string &name : FolderNames(holders)) {
+        const auto mapped = KernelText(holders / name / "dm/name");
         return " belongs to " + (mapped ? "the volume " + *mapped : "/dev/" + name);
     }
     return "";
@@ -89,10 +89,10 @@ std::string UseOf(const std::string &device)
             return device + use;
     }
     std::error_code none;
-    for (const auto &part : fs::directory_iterator(place, none)) {
-        if (!fs::exists(part.path() / "partition", none))
+    for (const std::string &name : FolderNames(place)) {
+        if (!fs::exists(place / name / "partition", none))
             continue;
-        const std::string use = UseOf("/dev/" + part.path().filename().string());
+        const std::string use = UseOf("/dev/" + name);
         if (!use.empty())
             return use;
     }

@@ -2,12 +2,12 @@
 #include "families.h"
 #include "frame/containers.h"
 #include "frame/failure.h"
+#include "frame/folder_names.h"
 #include "frame/program.h"
 #include "storage/device.h"
 
 #include "tavo_lvm.h"
 
-#include <filesystem>
 #include <memory>
 #include <string_view>
 
@@ -120,9 +120,8 @@ LVMVG ReadVg(const std::string &path, const std::string &attempted)
 // Throws a Failure when a volume of the group is in use.
 void RefuseUsedGroup(const std::string &path, const std::string &attempted)
 {
-    std::error_code none;
-    for (const auto &volume : std::filesystem::directory_iterator(path, none))
-        if (const std::string use = UseOf(volume.path()); !use.empty())
+    for (const std::string &volume : FolderNames(path))
+        if (const std::string use = UseOf(path + '/' + volume); !use.empty())
             throw BusyFailure(attempted, use, "free it first");
 }
 
