@@ -170,7 +170,8 @@ int Btree::Create(const char *path, std::unique_ptr<Btree> &out)
 Btree::~Btree()
 {
     KeepErrno keep;
-    sealed_ = false;  // where nobody asked for the outcome, something has failed: the stores are made again from the files
+    sealed_ =
+        false;  // where nobody asked for the outcome, something has failed: the stores are made again from the files
     Close();
 }
 
