@@ -105,6 +105,10 @@ TAVO_API int ErrTLIBSubnetToIpMask(char *szIn, char *szOut);
  * it has none), or -1 with *pCard untouched and ERR_BAD_PARAMETERS (NULL) or ERR_FILE_NOT_FOUND (no interface). */
 TAVO_API int TAVONetGetCard1(TAVONETCARD *pCard);
 
+/* The same of any interface, also of one that is the member of a bond: ERR_FILE_NOT_FOUND when the kernel has none of that
+ * name, ERR_BAD_PARAMETERS when it is no name. */
+TAVO_API int TAVONetGetCard(const char *szInterface, TAVONETCARD *pCard);
+
 /* Gives the interface pCard->szInterface its address. With DHCP a client that runs is killed, then a new one has 30 s to
  * get a lease; with a static address szIp and szMask are applied and stored. pPrevious is the record as it was (NULL when
  * there is none): where the address changes, the dynamic-DNS daemon is told. Then routes that are missing are added: the
@@ -152,6 +156,29 @@ TAVO_API int TAVOLnxSetHostname(const char *szName);
  * the lock files) or a code of the settings files. */
 TAVO_API int TAVONetHostsRefresh(void);
 
+/*
+ * A checkpoint of the whole network: addresses, routes of both families, MTU, link state, DHCP clients, host name, bonds and
+ * the files under /etc. A program takes one, changes the network by any number of calls or commands, and then keeps the
+ * result or puts everything back. The checkpoint is in /etc/network.checkpoint and belongs to the process that took it:
+ * when that one has died, the next function that changes the network, or TAVONetHostsRefresh, puts the network back;
+ * after a restart of the system the files. All three hold the network lock meanwhile. They return 0, or -1 with
+ * ERR_LOCK_FAILED or the codes named here.
+ */
+
+/* Takes a checkpoint for the calling process. ERR_FILE_EXISTS: another process that lives has one. ERR_READ_FAILED (one of
+ * the files cannot be read), or a code of the settings files: there is none now. */
+TAVO_API int TAVONetCheckpointTake(void);
+
+/* Ends the checkpoint and keeps the network as it is. Any process may do that. ERR_FILE_NOT_FOUND: there is
+ * none, or its process has died and the network has just been put back. ERR_REMOVE_FAILED: it is still there. */
+TAVO_API int TAVONetCheckpointEnd(void);
+
+/* Puts the network back as it was when the checkpoint was taken, and ends the checkpoint. Interfaces that are as they were
+ * are left alone. When interfaces were added or removed (bonds, VLANs), /etc/rc.network stops the network and starts it with
+ * the old files. A DHCP client that ran is started again without waiting for it. ERR_FILE_NOT_FOUND: there is none.
+ * ERR_OP_FAILURE: an address could not be set; all the rest is as it was. */
+TAVO_API int TAVONetCheckpointPutBack(void);
+
 /* Pushes the name servers of /etc/resolv.conf onto *ppServers, which may move. Returns how many, or -1 with
  * ERR_BAD_PARAMETERS, ERR_OPEN_FAILED or ERR_OUT_OF_MEMORY. */
 TAVO_API int TAVONetDNSGet(TLIBSZLIST **ppServers);
@@ -178,6 +205,12 @@ TAVO_API int TAVONetSetMTUValue(const char *szInterface, int mtu);
 /* 1 when another host answers for szAddr (one ping, at most 2 s), 0 when none does or the interface itself has the
  * address; -1 with ERR_BAD_PARAMETERS, or ERR_OP_FAILURE when /bin/ping cannot be run. */
 TAVO_API int TAVOIIpConflict(const char *szInterface, const char *szAddr);
+
+/* The same before the address is taken, by ARP as RFC 5227 describes it, so that a host that answers no ping is noticed, and
+ * one that is just taking the address: 1 or 0. It takes 4 to 7 times cMilliseconds (1 to 10000; the RFC has 1000) when no
+ * host answers. -1 with ERR_BAD_PARAMETERS, ERR_ACCESS_DENIED (root only), ERR_FILE_NOT_FOUND (no such interface) or
+ * ERR_OP_FAILURE (the interface is down). */
+TAVO_API int TAVONetAddressProbe(const char *szInterface, const char *szAddr, int cMilliseconds);
 
 /* 1 when the cable of the interface has something at its other end, else 0. */
 TAVO_API int BlTLIBIsConnected(const char *szInterface);

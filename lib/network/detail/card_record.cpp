@@ -42,7 +42,13 @@ CardState ReadCard(int index, TAVONETCARD *card)
     const auto interfaces = WiredInterfaces();
     if (index < 0 || static_cast<size_t>(index) >= interfaces.size())
         return CardState::absent;
-    const std::string &interface = interfaces[static_cast<size_t>(index)];
+    return ReadCard(interfaces[static_cast<size_t>(index)], card);
+}
+
+CardState ReadCard(const std::string &interface, TAVONETCARD *card)
+{
+    if (InterfaceAttribute(interface, "type").empty())
+        return CardState::absent;
     std::memset(card, 0, sizeof *card);
     Put(card->szInterface, interface);
     card->nMode = ReadSetting(InterfaceFile(interface), "BOOTPROTO") == "dhcp" ? TAVO_NET_DHCP : TAVO_NET_STATIC;

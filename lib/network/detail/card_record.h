@@ -4,6 +4,8 @@
 
 #include "tavo_net.h"
 
+#include <string>
+
 namespace tavo {
 
 enum class CardState {
@@ -16,6 +18,9 @@ enum class CardState {
 
 // Reads the index-th wired interface, from 0, into *card; of one without an address all the rest is filled in.
 CardState ReadCard(int index, TAVONETCARD *card);
+
+// The same of any interface, also one that is a member of a bond.
+CardState ReadCard(const std::string &interface, TAVONETCARD *card);
 
 }  // namespace tavo
 

@@ -1,23 +1,17 @@
 // The network as it was before a change: its record, and how it is put back.
 #include "network/detail/checkpoint.h"
 
-#include "core/detail/keep_fault.h"
-#include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
 #include "core/detail/open_file.h"
 #include "core/detail/process_list.h"
-#include "core/detail/run_command.h"
 #include "core/detail/text_fields.h"
 #include "network/detail/connected_route.h"
-#include "network/detail/dhcp_client.h"
-#include "network/detail/file_state.h"
 #include "network/detail/kernel_interface.h"
-#include "tavo_file.h"
+#include "network/detail/process_identity.h"
+#include "network/detail/undo_action.h"
 
 #include <algorithm>
 #include <cerrno>
-#include <charconv>
-#include <csignal>
 #include <cstdio>
 #include <cstring>
 
@@ -25,14 +19,8 @@ namespace tavo {
 namespace {
 
 constexpr const char *kRecord = "/etc/network.undo";
-constexpr const char *kSystemSettings = "/etc/tavoinfo.conf";
 
 constinit int noted_in = -1;  // the record of the change that this process makes
-
-std::string BootId()
-{
-    return ReadKernelFile("/proc/sys/kernel/random/boot_id").value_or("unknown\n");
-}
 
 // The first line of the record: the command in progress, its process once it has one. It is written over, so its length is
 // fixed.
@@ -45,13 +33,6 @@ std::string CommandLine(pid_t pid, const std::string &beginning, std::string_vie
     std::snprintf(line, sizeof line, "command %10d %20s %-*s\n", static_cast<int>(pid), beginning.c_str(),
                   static_cast<int>(kLongestCommand), text.c_str());
     return line;
-}
-
-pid_t ToPid(std::string_view text)
-{
-    pid_t pid = 0;
-    std::from_chars(text.data(), text.data() + text.size(), pid);
-    return pid;
 }
 
 // The process is noted when it runs, and its parent may have died just before; so the text counts, too.
@@ -75,100 +56,7 @@ void KillCommand(std::string_view line)
     }
 }
 
-void EndClients(const UndoStep &step)
-{
-    for (const Process &process : ListProcesses()) {
-        const auto words = SplitFields(process.command);
-        if (words.empty() || !words[0].substr(words[0].rfind('/') + 1).starts_with("dhcpcd") ||
-            std::find(words.begin() + 1, words.end(), step.target) == words.end())
-            continue;
-        const std::string beginning = BeginningOf(process.pid);
-        if (process.pid != ToPid(step.value) || beginning != step.more)
-            EndProcess(process.pid, beginning);
-    }
-}
-
-void PutBackSetting(const UndoStep &step)
-{
-    const KeepFault keep;
-    const bool shared = step.target == kSystemSettings;
-    const LockHold lock(shared ? TAVO_LOCK_TAVOINFO | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING : TAVO_LOCK_EXCLUSIVE,
-                        5);
-    if (step.kind == UndoStep::setting)
-        TLIBFileSetKeyValue(step.target.c_str(), step.more.c_str(), step.value.c_str(), nullptr);
-    else
-        TLIBFileRemoveKey(step.target.c_str(), step.more.c_str());
-}
-
-mode_t ToMode(const std::string &text)
-{
-    mode_t mode = 0644;
-    std::from_chars(text.data(), text.data() + text.size(), mode, 8);
-    return mode;
-}
-
-bool IsLive(const std::string &route)
-{
-    const auto live = LiveRoutes();
-    return std::any_of(live.begin(), live.end(), [&](const Route &one) { return RouteText(one) == route; });
-}
-
-// False when an address could not be set.
-bool Do(const UndoStep &step, bool cleared)
-{
-    switch (step.kind) {
-    case UndoStep::file:
-        PutBack(FileState{step.target, step.value, ToMode(step.more)});
-        return true;
-    case UndoStep::no_file:
-        PutBack(FileState{step.target, std::nullopt, 0});
-        return true;
-    case UndoStep::setting:
-    case UndoStep::no_setting:
-        PutBackSetting(step);
-        return true;
-    case UndoStep::host_name:
-        (void)!::sethostname(step.target.c_str(), step.target.size());
-        return true;
-    case UndoStep::command:
-        RunCommandQuietly(step.target);
-        return true;
-    case UndoStep::address:
-        return RunCommandQuietly(step.target) == 0;
-    case UndoStep::route:
-        if (cleared || !IsLive(step.value))
-            RunCommandQuietly(step.target);
-        return true;
-    case UndoStep::end_clients:
-        EndClients(step);
-        return true;
-    case UndoStep::client:
-        if (!HasDhcpClient(step.target))
-            StartDhcpClient(step.target);
-        return true;
-    }
-    return true;
-}
-
 }  // namespace
-
-std::string BeginningOf(pid_t pid)
-{
-    const std::string stat = ReadKernelFile(("/proc/" + std::to_string(pid) + "/stat").c_str()).value_or("");
-    const auto field = SplitFields(std::string_view(stat).substr(std::min(stat.rfind(')') + 1, stat.size())));
-    constexpr size_t start_time = 19;  // after the name
-    return field.size() > start_time ? std::string(field[start_time]) : "";
-}
-
-void EndProcess(pid_t pid, std::string_view beginning)
-{
-    if (pid <= 0 || beginning.empty() || BeginningOf(pid) != beginning)
-        return;
-    ::kill(pid, SIGKILL);
-    constexpr int rounds = 100;
-    for (int i = 0; i < rounds && BeginningOf(pid) == beginning && !IsZombie(pid); ++i)
-        ::usleep(10000);
-}
 
 Checkpoint::~Checkpoint()
 {
@@ -209,7 +97,7 @@ bool Checkpoint::PutBack(bool cleared)
 {
     bool done = true;
     for (const UndoStep &step : steps_)
-        done = (step.after_death || Do(step, cleared)) && done;
+        done = (step.after_death || CarryOut(step, cleared)) && done;
     End();
     return done;
 }
@@ -217,7 +105,7 @@ bool Checkpoint::PutBack(bool cleared)
 void Checkpoint::PutBackAll()
 {
     for (const UndoStep &step : steps_)
-        Do(step, true);
+        CarryOut(step, true);
     End();
 }
 
@@ -225,7 +113,7 @@ void Checkpoint::PutBackFiles()
 {
     for (const UndoStep &step : steps_) {
         if (step.IsOfFiles())
-            Do(step, false);
+            CarryOut(step, false);
     }
 }
 
@@ -254,7 +142,7 @@ void FinishCutOffChange(Where where)
             KillCommand(command);
         for (const UndoStep &step : *steps) {
             if (same_boot || step.IsOfFiles())
-                Do(step, true);
+                CarryOut(step, true);
         }
         if (same_boot)
             RepairRoutes();

@@ -12,6 +12,7 @@
 
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include <sys/types.h>
@@ -34,6 +35,8 @@ class Checkpoint {
     void AddGateway();  // the kernel's default routes
     // Address, routes and DHCP client. The address is that of the interface file or of the lease; of neither, the kernel's.
     void AddCard(const std::string &interface);
+    // Everything that an interface has in the kernel, and only that.
+    void AddLiveCard(const std::string &interface);
     void AddIpv6(const std::string &interface);  // switched on or off, addresses, routes
     // An IPv6 address that the change adds or removes.
     void AddIpv6Address(const std::string &interface, const std::string &address, int length);
@@ -56,19 +59,20 @@ class Checkpoint {
     // Notes a command that is about to be started (`pid` is 0, `beginning` "-") or runs, so that whoever finishes ends it first.
     static void NoteCommand(pid_t pid, const std::string &beginning, std::string_view command);
 
+    void Add(UndoStep step) { steps_.push_back(std::move(step)); }
+    const std::vector<UndoStep> &Steps() const { return steps_; }
+
   private:
+    void AddClientsEnd(const std::string &interface, pid_t client);
+    void AddFurtherAddresses(const std::string &interface);
     void AddRoutes(const std::vector<Route> &routes, const std::string &interface);
 
     std::vector<UndoStep> steps_;
     Fd record_;
 };
 
-// When a process began, in ticks since the system did: with it a number that is used again is told from the old one.
-// Empty for a process that is not there.
-std::string BeginningOf(pid_t pid);
-
-// Kills it and waits for its end, unless it is another process by now.
-void EndProcess(pid_t pid, std::string_view beginning);
+// What the kernel has for an interface, as one comparable text.
+std::string LiveCardText(const std::string &interface);
 
 // Finishes what a process that died has left: everything is as before its change. After a restart of the system only
 // files are put back. The caller holds the network lock.

@@ -4,6 +4,7 @@
 #include "core/detail/child_process.h"
 #include "core/detail/child_status.h"
 #include "network/detail/checkpoint.h"
+#include "network/detail/process_identity.h"
 
 namespace tavo {
 

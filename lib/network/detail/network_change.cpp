@@ -4,6 +4,7 @@
 #include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
 #include "network/detail/checkpoint.h"
+#include "network/detail/network_checkpoint.h"
 
 #include <unistd.h>
 
@@ -26,6 +27,12 @@ bool IsOutermost()
     return false;
 }
 
+void FinishWhatWasLeft(Where where)
+{
+    FinishCutOffChange(where);
+    PutBackAbandonedCheckpoint(where);
+}
+
 }  // namespace
 
 void KeepHostsTrueAfterwards(Where where)
@@ -41,7 +48,7 @@ void KeepHostsTrueAfterwards(Where where)
 int FinishAndKeepHostsTrue(Where where)
 {
     if (IsOutermost())
-        FinishCutOffChange(where);
+        FinishWhatWasLeft(where);
     const int code = UpdateHosts();
     if (code != 0)
         LogErrorAt(where, "%s:%d Set %s error.", kHostsFile);
@@ -56,7 +63,7 @@ int ChangeNetwork(FunctionRef<int()> body, unsigned more_locks, Where where)
         if (!lock)
             return Fail(ERR_LOCK_FAILED, where);
         if (IsOutermost())
-            FinishCutOffChange(where);
+            FinishWhatWasLeft(where);
         result = body();
         KeepHostsTrue(where);
     }

@@ -153,6 +153,10 @@ Family NetworkFamily()
                      run.Show(name);
                  }),
             CALL(TAVOLnxSetHostname, kInChild, { run(f, "tavo"); }),
+            CALL(TAVONetAddressProbe, kAnswers | kNoFaults, { run(f, "eth0", "192.0.2.2", 1); }),
+            CALL(TAVONetCheckpointEnd, kAnswers | kSteps, { run(f); }),
+            CALL(TAVONetCheckpointPutBack, kAnswers | kSteps, { run(f); }),
+            CALL(TAVONetCheckpointTake, kAnswers | kSteps, { run(f); }),
             CALL(TAVONetDNSGet, 0,
                  {
                      Found found;
@@ -181,6 +185,11 @@ Family NetworkFamily()
             CALL(TAVONetDhcp6Wait, kAnswers | kNoFaults, { run(f, "eth0", 0); }),
             CALL(TAVONetDhcpTest, 0, { run(f, "eth0", 1); }),
             CALL(TAVONetHostsRefresh, kAnswers | kSteps, { run(f); }),
+            CALL(TAVONetGetCard, kAnswers,
+                 {
+                     TAVONETCARD card = {};
+                     run(f, "eth0", &card);
+                 }),
             CALL(TAVONetGetCard1, kAnswers,
                  {
                      TAVONETCARD card = {};

@@ -1,6 +1,8 @@
 // tavoctl net and discover on cards of a kernel: what they show, refuse and change, and what they put back.
 #include "tools/tavoctl/run_tavoctl.h"
 
+#include "tavo_net.h"
+
 #include "support/eventually.h"
 #include "support/rounds.h"
 #include "support/scratch_dir.h"
@@ -12,6 +14,9 @@
 #include <memory>
 #include <optional>
 #include <random>
+
+#include <netinet/in.h>
+#include <sys/socket.h>
 
 using test::Eventually;
 using test::Node;
@@ -104,6 +109,18 @@ TEST_F(Net, ShowsWhatWasSet)
         EXPECT_THAT(Tavoctl({"net", "show"}).out, HasSubstr("192.0.2.20"));
         return true;
     }));
+    VirtualCable second("second");
+    second.Plug(*here_, "eth1");
+    EXPECT_TRUE(here_->Run([] {
+        const nlohmann::json cards = test::Facts({"net", "show", "--json"});
+        EXPECT_EQ(cards.size(), 2u) << cards;
+        EXPECT_EQ(cards.at(1).at("interface"), "eth1");
+        EXPECT_TRUE(cards.at(1).at("address").is_null());
+        EXPECT_EQ(test::Facts({"net", "show", "--json", "eth1"}), cards.at(1));
+        EXPECT_THAT(Tavoctl({"net", "show"}).out, AllOf(HasSubstr("eth0"), HasSubstr("eth1"), HasSubstr("attic")));
+        EXPECT_EQ(Tavoctl({"net", "show", "eth7"}).status, 3);
+        return true;
+    }));
 }
 
 TEST_F(Net, RefusesWhatCannotBe)
@@ -152,6 +169,60 @@ TEST_F(Net, RefusesWhatCannotBe)
     }));
 }
 
+// A host that answers no ping must answer ARP.
+TEST_F(Net, TakesNoAddressOfAnotherHost)
+{
+    ASSERT_EQ(there_->Shell("echo 1 >/proc/sys/net/ipv4/icmp_echo_ignore_all"), 0);
+    EXPECT_TRUE(here_->Run([] {
+        const std::string live = Live();
+        EXPECT_EQ(TAVOIIpConflict("eth0", "192.0.2.99"), 0) << "as it stays";
+        EXPECT_EQ(TAVONetAddressProbe("eth0", "192.0.2.99", 20), 1);
+        EXPECT_EQ(TAVONetAddressProbe("eth0", "192.0.2.98", 20), 0);
+        EXPECT_EQ(TAVONetAddressProbe("eth0", "192.0.2.10", 20), 0) << "our own";
+        EXPECT_EQ(TAVONetAddressProbe("eth7", "192.0.2.98", 20), -1);
+        EXPECT_EQ(TLIBErrGet(), ERR_FILE_NOT_FOUND);
+        EXPECT_EQ(Tavoctl({"net", "check-address", "192.0.2.99"}).out, "used\n");
+        const Ran ran = Tavoctl({"net", "set", "192.0.2.99/24"});
+        EXPECT_EQ(ran.status, 4) << ran;
+        EXPECT_THAT(ran.err, HasSubstr("another host uses it"));
+        EXPECT_EQ(Live(), live);
+        EXPECT_EQ(Tavoctl({"net", "set", "--no-probe", "192.0.2.99/24"}).status, 0);
+        return true;
+    }));
+    // Of two that want it at the same time not both get it.
+    EXPECT_TRUE(here_->Run([] { return test::ShellStatus("ifconfig eth0 192.0.2.10 netmask 255.255.255.0") == 0; }));
+    const auto finds_it_free = [](const Node &node) {
+        return node.Run([] { return TAVONetAddressProbe("eth0", "192.0.2.50", 300) == 0; });
+    };
+    const pid_t other = ::fork();
+    if (other == 0)
+        ::_exit(finds_it_free(*there_) ? 1 : 0);
+    const bool free = finds_it_free(*here_);
+    int status = 1;
+    ::waitpid(other, &status, 0);
+    EXPECT_FALSE(free && status != 0);
+}
+
+TEST_F(Net, ShowsWhichPortsAreTaken)
+{
+    EXPECT_TRUE(here_->Run([] {
+        const int fd = ::socket(AF_INET6, SOCK_STREAM | SOCK_CLOEXEC, 0);
+        if (fd < 0)
+            return true;  // no IPv6 here
+        sockaddr_in6 where{};
+        where.sin6_family = AF_INET6;
+        where.sin6_port = htons(5121);
+        EXPECT_EQ(::bind(fd, reinterpret_cast<const sockaddr *>(&where), sizeof where), 0);
+        EXPECT_EQ(::listen(fd, 1), 0);
+        const Ran used = Tavoctl({"net", "check-port", "5121"});
+        EXPECT_EQ(used.status, 4) << used;
+        EXPECT_EQ(used.out, "used\n");
+        EXPECT_THAT(Tavoctl({"net", "check-port", "--json", "5122"}).out, HasSubstr(R"("used": false)"));
+        ::close(fd);
+        return true;
+    }));
+}
+
 TEST_F(Net, TellsWhetherAnAddressIsFree)
 {
     EXPECT_TRUE(here_->Run([] {
@@ -182,9 +253,9 @@ TEST_F(Net, ATrialEndsWithoutAnAnswer)
 {
     EXPECT_TRUE(here_->Run([] {
         const std::string live = Live();
-        RunningTavoctl trial({"net", "set", "--try", "2", "192.0.2.20/24", "--gateway", "192.0.2.2"});
+        RunningTavoctl trial({"net", "set", "--no-probe", "--try", "2", "192.0.2.20/24", "--gateway", "192.0.2.2"});
         EXPECT_TRUE(Eventually([] { return Live().find("via 192.0.2.2 ") != std::string::npos; }));
-        const Ran second = Tavoctl({"net", "set", "--try", "9", "192.0.2.30/24"});
+        const Ran second = Tavoctl({"net", "set", "--no-probe", "--try", "9", "192.0.2.30/24"});
         EXPECT_EQ(second.status, 4) << second;
         const Ran ran = trial.Wait();
         EXPECT_EQ(ran.status, 1);
@@ -197,7 +268,7 @@ TEST_F(Net, ATrialEndsWithoutAnAnswer)
 TEST_F(Net, ATrialThatIsConfirmedStays)
 {
     EXPECT_TRUE(here_->Run([] {
-        RunningTavoctl trial({"net", "set", "--try", "60", "192.0.2.20/24"});
+        RunningTavoctl trial({"net", "set", "--no-probe", "--try", "60", "192.0.2.20/24"});
         EXPECT_TRUE(Eventually([] { return Live().find("192.0.2.20/24") != std::string::npos; }));
         EXPECT_EQ(Tavoctl({"net", "confirm"}).status, 0);
         EXPECT_EQ(trial.Wait().status, 0);
@@ -206,7 +277,8 @@ TEST_F(Net, ATrialThatIsConfirmedStays)
         EXPECT_EQ(Tavoctl({"net", "confirm"}).status, 3) << "once";
 
         // The administrator's line is cut off with his address; he comes back by the new one and confirms.
-        std::optional<RunningTavoctl> cut(std::in_place, test::Words{"net", "set", "--try", "60", "192.0.2.30/24"});
+        std::optional<RunningTavoctl> cut(std::in_place,
+                                          test::Words{"net", "set", "--no-probe", "--try", "60", "192.0.2.30/24"});
         EXPECT_TRUE(Eventually([] { return Live().find("192.0.2.30/24") != std::string::npos; }));
         ::usleep(500000);
         ::kill(cut->Pid(), SIGKILL);
@@ -215,12 +287,97 @@ TEST_F(Net, ATrialThatIsConfirmedStays)
         EXPECT_THAT(Live(), HasSubstr("192.0.2.30/24"));
         EXPECT_TRUE(TrialIsOver());
 
-        const Ran kept = test::TavoctlAtTerminal({"net", "set", "--try", "60", "192.0.2.40/24"}, "y\n");
+        const Ran kept = test::TavoctlAtTerminal({"net", "set", "--no-probe", "--try", "60", "192.0.2.40/24"}, "y\n");
         EXPECT_EQ(kept.status, 0) << kept;
         EXPECT_THAT(Live(), HasSubstr("192.0.2.40/24"));
-        const Ran given_up = test::TavoctlAtTerminal({"net", "set", "--try", "60", "192.0.2.50/24"}, "n\n");
+        const Ran given_up =
+            test::TavoctlAtTerminal({"net", "set", "--no-probe", "--try", "60", "192.0.2.50/24"}, "n\n");
         EXPECT_EQ(given_up.status, 1) << given_up;
         EXPECT_THAT(Live(), HasSubstr("192.0.2.40/24"));
+        return true;
+    }));
+}
+
+// Everything that was changed meanwhile comes back, by whatever it was changed, and cards that were not changed are not
+// touched. When the guardian is killed, the next change or refresh does it.
+TEST_F(Net, ATrialPutsTheWholeNetworkBack)
+{
+    VirtualCable second("second");
+    second.Plug(*here_, "eth1");
+    EXPECT_TRUE(here_->Run([] {
+        EXPECT_EQ(
+            test::ShellStatus(
+                "ifconfig eth1 198.51.100.5 netmask 255.255.255.0 up; "
+                "ip addr add 192.0.2.11/24 dev eth0; ip addr add 203.0.113.5/28 dev eth0; "
+                "route add -net 233.252.0.0 netmask 255.255.255.0 gw 192.0.2.7; "
+                "ip -6 addr add 2001:db8::5/64 dev eth0; ip -6 route add 2001:db8:9::/48 via 2001:db8::1 dev eth0"),
+            0);
+        WriteFile("/etc/tavoinfo.conf", "eth0_mtu=\"1500\"\nother=\"x\"\n");
+        WriteFile("/etc/resolv.conf", "nameserver 192.0.2.53\n");
+        EXPECT_EQ(TAVONetHostsRefresh(), 0);
+        const auto all = [] {
+            std::string text = Live() + ReadFile("/etc/resolv.conf") + ReadFile("/etc/tavoinfo.conf") +
+                               ReadFile("/etc/hosts") + ReadFile(kIfcfg) + ReadFile(kNetwork);
+            const test::ScratchDir dir;
+            test::ShellStatus("{ ip route; ip -4 addr show dev eth1 | grep inet; ip -6 addr show dev eth0 scope global "
+                              "| grep inet6 | "
+                              "sed 's/ tentative//'; "
+                              "ip -6 route show dev eth0 | grep via; cat /sys/class/net/eth0/mtu; hostname; "
+                              "ls /etc/sysconfig/network-scripts; } >" +
+                              (dir / "all"));
+            return text + ReadFile(dir / "all");
+        };
+        const auto change = [] {
+            EXPECT_EQ(TAVOLnxSetHostname("attic"), 0);
+            EXPECT_EQ(TAVONetSetMTUValue("eth0", 1400), 0);
+            EXPECT_EQ(TAVONetSetMTUValue("eth1", 1300), 0);
+            EXPECT_EQ(Tavoctl({"net", "dns", "--none"}).status, 0);
+            EXPECT_EQ(test::ShellStatus("ip addr add 203.0.113.9/24 dev eth0; ip -6 addr add 2001:db8::6/64 dev eth0"),
+                      0);
+            WriteFile("/etc/sysconfig/network-scripts/more-eth0", "address 203.0.113.9/24\n");
+        };
+        const std::string before = all();
+        {
+            RunningTavoctl trial(
+                {"net", "set", "--no-probe", "--try", "60", "192.0.2.20/25", "--gateway", "192.0.2.2"});
+            EXPECT_TRUE(Eventually([] { return Live().find("via 192.0.2.2 ") != std::string::npos; }));
+            change();
+            EXPECT_NE(all(), before);
+            EXPECT_EQ(TAVONetCheckpointTake(), -1) << "there is one";
+            EXPECT_EQ(TLIBErrGet(), ERR_FILE_EXISTS);
+            test::ShellStatus("kill $(cat /var/run/tavo-net-trial.pid)");
+            EXPECT_EQ(trial.Wait().status, 1);
+        }
+        EXPECT_EQ(all(), before);
+        {
+            RunningTavoctl trial({"net", "set", "--no-probe", "--try", "60", "192.0.2.20/25"});
+            EXPECT_TRUE(Eventually([] { return Live().find("192.0.2.20") != std::string::npos; }));
+            ::usleep(300000);
+            change();
+            test::ShellStatus("kill -9 $(cat /var/run/tavo-net-trial.pid)");
+            EXPECT_EQ(trial.Wait().status, 1);
+        }
+        EXPECT_EQ(TAVONetHostsRefresh(), 0);
+        EXPECT_EQ(all(), before);
+        EXPECT_FALSE(std::filesystem::exists("/etc/network.checkpoint"));
+
+        // In one process: kept, given up, and of another start of the system, of which only the files come back.
+        EXPECT_EQ(TAVONetCheckpointEnd(), -1);
+        EXPECT_EQ(TLIBErrGet(), ERR_FILE_NOT_FOUND);
+        EXPECT_EQ(TAVONetCheckpointTake(), 0);
+        change();
+        EXPECT_EQ(TAVONetCheckpointPutBack(), 0);
+        EXPECT_EQ(all(), before);
+        EXPECT_EQ(TAVONetCheckpointTake(), 0);
+        EXPECT_EQ(TAVONetCheckpointEnd(), 0);
+        EXPECT_EQ(TAVONetCheckpointTake(), 0);
+        std::string record = ReadFile("/etc/network.checkpoint");
+        record.replace(record.find("boot ") + 5, 4, "past");
+        change();
+        WriteFile("/etc/network.checkpoint", record);
+        EXPECT_EQ(TAVONetHostsRefresh(), 0);
+        EXPECT_EQ(test::ReadFile("/sys/class/net/eth0/mtu"), "1400\n");
+        EXPECT_EQ(ReadFile("/etc/tavoinfo.conf"), "eth0_mtu=\"1500\"\nother=\"x\"\n");
         return true;
     }));
 }
@@ -229,10 +386,15 @@ TEST_F(Net, AChangeThatFailsIsNotTried)
 {
     EXPECT_TRUE(here_->Run([] {
         const std::string live = Live();
-        const Ran ran = Tavoctl({"net", "set", "--try", "60", "192.0.2.20/24", "--gateway", "198.51.100.1"});
+        const Ran ran =
+            Tavoctl({"net", "set", "--no-probe", "--try", "60", "192.0.2.20/24", "--gateway", "198.51.100.1"});
         EXPECT_EQ(ran.status, 1);
         EXPECT_THAT(ran.err, HasSubstr("the old settings are back"));
         EXPECT_TRUE(TrialIsOver());
+        // Nor is half of one that nobody tries.
+        const Ran half = Tavoctl({"net", "set", "--no-probe", "192.0.2.20/24", "--gateway", "198.51.100.1"});
+        EXPECT_EQ(half.status, 1);
+        EXPECT_THAT(half.err, HasSubstr("the old settings are back"));
         return IsAsBefore(live);
     }));
 }
@@ -258,7 +420,8 @@ TEST_F(Net, AKilledTrialPutsTheOldSettingsBack)
             bool same = true;
             for (int round = 0; round < rounds && same; ++round) {
                 {
-                    const RunningTavoctl trial({"net", "set", "--try", "1", "192.0.2.20/25", "--gateway", "192.0.2.2"});
+                    const RunningTavoctl trial(
+                        {"net", "set", "--no-probe", "--try", "1", "192.0.2.20/25", "--gateway", "192.0.2.2"});
                     // Until it has begun, nothing is changed; from then on at any moment of the change and the wait.
                     Eventually([&] { return !TrialIsOver() && (round != 0 || Live() != live); });
                     ::usleep(static_cast<useconds_t>(random() % 600000));

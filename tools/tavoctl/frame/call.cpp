@@ -28,6 +28,11 @@ void Call::Print(const Record &record) const
         Terminal::Page(record.Text());
 }
 
+void Call::Print(const Record &record, const Table &table) const
+{
+    Terminal::Page(record.Text() + "\n" + table.Text(style));
+}
+
 void Call::PrintValue(const std::string &value, const Record &record) const
 {
     if (json)

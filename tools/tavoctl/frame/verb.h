@@ -138,6 +138,8 @@ struct Call {
 
     void Print(const Table &table) const;
     void Print(const Record &record) const;
+    // For people alone: facts of the whole above a list.
+    void Print(const Record &record, const Table &table) const;
     void PrintValue(const std::string &value, const Record &record) const;
 
   private:

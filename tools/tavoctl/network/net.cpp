@@ -4,11 +4,14 @@
 #include "frame/failure.h"
 #include "frame/folder_names.h"
 #include "frame/program.h"
+#include "network/net_card.h"
 #include "network/net_verbs.h"
 
 #include "tavo_net.h"
 
 #include <algorithm>
+
+#include <unistd.h>
 
 namespace tavoctl {
 
@@ -36,56 +39,59 @@ const ArgumentKind interface_kind = {
 
 namespace {
 
+// Of the appliance as a whole.
 struct NetFacts {
-    TAVONETCARD card;
-    std::optional<std::string> hostname, live_gateway;
+    std::optional<std::string> hostname, gateway, live_gateway;
     std::vector<std::string> dns;
-    std::vector<std::string> ipv6_addresses;
-    std::optional<bool> wake_on_lan;
 };
 
 constexpr Column<NetFacts> net_columns[] = {
     {"hostname", field<&NetFacts::hostname>},
+    {"gateway", field<&NetFacts::gateway>},
+    {"live_gateway", field<&NetFacts::live_gateway>},
+    {"dns", field<&NetFacts::dns>},
+};
+
+struct CardFacts {
+    TAVONETCARD card;
+    NetFacts net;
+    std::vector<std::string> ipv6_addresses;
+    std::optional<bool> wake_on_lan;
+};
+
+constexpr Column<CardFacts> card_columns[] = {
     {"interface",
-     [](const NetFacts &n) {
-         return std::string(n.card.szInterface);
+     [](const CardFacts &c) {
+         return std::string(c.card.szInterface);
      }},
-    {"mode", [](const NetFacts &n) -> std::string { return n.card.nMode == TAVO_NET_DHCP ? "dhcp" : "static"; },
+    {"mode", [](const CardFacts &c) -> std::string { return c.card.nMode == TAVO_NET_DHCP ? "dhcp" : "static"; },
      "dhcp or static"},
     {"address",
-     [](const NetFacts &n) {
-         return Maybe(n.card.szIp);
+     [](const CardFacts &c) {
+         return Maybe(c.card.szIp);
      }},
     {"mask",
-     [](const NetFacts &n) {
-         return Maybe(n.card.szMask);
+     [](const CardFacts &c) {
+         return Maybe(c.card.szMask);
      }},
-    {"network",
-     [](const NetFacts &n) {
-         return Maybe(n.card.szNetwork);
-     }},
-    {"broadcast",
-     [](const NetFacts &n) {
-         return Maybe(n.card.szBroadcast);
-     }},
-    {"gateway", [](const NetFacts &n) { return Maybe(n.card.szGateway); }, "as it is stored"},
-    {"live_gateway", field<&NetFacts::live_gateway>, "as it is used"},
-    {"dns", field<&NetFacts::dns>, "the name servers"},
+    {"network", [](const CardFacts &c) { return Maybe(c.card.szNetwork); }, "", in_details},
+    {"broadcast", [](const CardFacts &c) { return Maybe(c.card.szBroadcast); }, "", in_details},
     {"mac",
-     [](const NetFacts &n) {
-         return Maybe(n.card.szMac);
+     [](const CardFacts &c) {
+         return Maybe(c.card.szMac);
      }},
-    {"mtu", [](const NetFacts &n) { return n.card.nMtu; }, "", in_list, "bytes"},
+    {"mtu", [](const CardFacts &c) { return c.card.nMtu; }, "", in_list, "bytes"},
     {"link",
-     [](const NetFacts &n) {
-         return n.card.fLink != 0;
+     [](const CardFacts &c) {
+         return c.card.fLink != 0;
      }},
-    {"ipv6",
-     [](const NetFacts &n) {
-         return BlTAVONetIPv6IsEnabled(n.card.szInterface) == 1;
-     }},
-    {"ipv6_addresses", field<&NetFacts::ipv6_addresses>},
-    {"wake_on_lan", field<&NetFacts::wake_on_lan>},
+    {"ipv6", [](const CardFacts &c) { return BlTAVONetIPv6IsEnabled(c.card.szInterface) == 1; }, "", in_details},
+    {"ipv6_addresses", field<&CardFacts::ipv6_addresses>, "", in_details},
+    {"wake_on_lan", field<&CardFacts::wake_on_lan>, "", in_details},
+    {"hostname", [](const CardFacts &c) { return c.net.hostname; }, "of the appliance, as the next three", in_details},
+    {"gateway", [](const CardFacts &c) { return c.net.gateway; }, "as it is stored", in_details},
+    {"live_gateway", [](const CardFacts &c) { return c.net.live_gateway; }, "as it is used", in_details},
+    {"dns", [](const CardFacts &c) { return c.net.dns; }, "the name servers", in_details},
 };
 
 struct AddressUse {
@@ -118,19 +124,45 @@ std::optional<std::string> PresentGateway()
     return TAVONetDefaultGatewayGet(gateway, sizeof gateway) == 0 ? Maybe(gateway) : std::nullopt;
 }
 
-Action NetShow(Arguments &)
+NetFacts PresentNet()
 {
-    return [](Call &call) {
-        NetFacts facts = {FirstCard("show the network"), {}, PresentGateway(), PresentServers(), {}, {}};
-        char name[64] = "";
-        if (TAVOLnxGetHostname(name, sizeof name) == 0)
-            facts.hostname = name;
-        StringList list;
-        if (TAVONetIPv6AddrEnum(facts.card.szInterface, list.Address()) >= 0)
-            facts.ipv6_addresses = list.Items();
-        if (const int wakes = TAVONetWolGet(facts.card.szInterface); wakes >= 0)
-            facts.wake_on_lan = wakes == 1;
-        call.One(net_columns, facts);
+    NetFacts facts = {{}, {}, PresentGateway(), PresentServers()};
+    char text[64] = "";
+    if (TAVOLnxGetHostname(text, sizeof text) == 0)
+        facts.hostname = text;
+    if (TAVONetDefaultGatewayGetConf(text, sizeof text) == 0)
+        facts.gateway = Maybe(text);
+    return facts;
+}
+
+CardFacts FactsOf(const TAVONETCARD &card, const NetFacts &net)
+{
+    CardFacts facts = {card, net, {}, {}};
+    StringList list;
+    if (TAVONetIPv6AddrEnum(card.szInterface, list.Address()) >= 0)
+        facts.ipv6_addresses = list.Items();
+    if (const int wakes = TAVONetWolGet(card.szInterface); wakes >= 0)
+        facts.wake_on_lan = wakes == 1;
+    return facts;
+}
+
+Action NetShow(Arguments &in)
+{
+    const auto only = in.OptionalText("INTERFACE", interface_kind, "all about this one");
+    return [=](Call &call) {
+        const NetFacts net = PresentNet();
+        if (*only)
+            return call.One(card_columns, FactsOf(CardNamed("show " + **only, **only), net));
+        std::vector<CardFacts> cards;
+        for (const std::string &name : InterfaceNames()) {
+            TAVONETCARD card = {};
+            if (TAVONetGetCard(name.c_str(), &card) == 0 && card.szMac[0])
+                cards.push_back(FactsOf(card, net));
+        }
+        if (!call.json && call.style.columns.empty() && call.style.headings)
+            call.Print(Record(net_columns, net), call.TableOf(card_columns, cards));
+        else
+            call.List(card_columns, cards);
     };
 }
 
@@ -202,9 +234,37 @@ Action NetCheckAddress(Arguments &in)
     return [=](Call &call) {
         const std::string attempted = "check " + *address;
         const std::string interface = *wanted ? **wanted : std::string(FirstCard(attempted).szInterface);
-        const int used = TAVOIIpConflict(interface.c_str(), address->c_str());
+        int used = TAVOIIpConflict(interface.c_str(), address->c_str());
         Must(used >= 0, attempted);
+        const TAVONETCARD card = CardNamed(attempted, interface);
+        // Many hosts answer no ping; ARP they must answer.
+        if (used == 0 && card.fLink && *address != card.szIp && ::geteuid() == 0) {
+            used = TAVONetAddressProbe(card.szInterface, address->c_str(), probe_milliseconds);
+            Must(used >= 0, attempted);
+        }
         call.Value(used ? "used" : "free", address_columns, AddressUse{*address, interface, used == 1});
+        call.status = used ? exit_busy : exit_done;
+    };
+}
+
+struct PortUse {
+    int64_t port;
+    bool used;
+};
+
+constexpr Column<PortUse> port_columns[] = {
+    {"port", field<&PortUse::port>},
+    {"used", field<&PortUse::used>, "by a TCP or UDP socket, of IPv4 or IPv6"},
+};
+
+Action NetCheckPort(Arguments &in)
+{
+    const auto port = in.Number("PORT", "PORT", "1 to 65535", 1, 65535);
+    return [=](Call &call) {
+        TLIBErrSet(ERR_SUCCESS);
+        const bool used = BlTLIBIsPortInUse(static_cast<int>(**port)) == 1;
+        Must(used || TLIBErrGet() == ERR_SUCCESS, "check port " + std::to_string(**port));
+        call.Value(used ? "used" : "free", port_columns, PortUse{**port, used});
         call.status = used ? exit_busy : exit_done;
     };
 }
@@ -214,16 +274,17 @@ Action NetCheckAddress(Arguments &in)
 void AddNet(Program &program)
 {
     Family &net = program.Add("net", "Interfaces, addresses, names and bonds");
-    net.Add("show", reads, Answer::One(net_columns), R"(Shows the first wired interface, the gateway as it is stored and
-as it is used, the name servers and the host name.
+    net.Add("show", reads, Answer::List(card_columns).OrOne(card_columns), R"(Shows the host name, the gateway as it is
+stored and as it is used, the name servers and the interfaces, or all about one of them.
 
 tavoctl net show
+tavoctl net show eth0
 tavoctl net show --json)",
             NetShow);
     net.Add("set", changes, Answer::Change(), R"(Gives an interface its address: one from DHCP, or a static one. If you
 reach the appliance by that very interface, say --try: unless the new settings are confirmed in time, here or with
 `tavoctl net confirm` from another connection, the old ones come back, also when this command has ended with its
-connection.
+connection. A static address is taken only when no other host answers for it.
 
 tavoctl net set dhcp
 tavoctl net set 192.0.2.10/24 --gateway 192.0.2.1
@@ -253,12 +314,19 @@ tavoctl net hostname attic)",
 
 tavoctl net mtu eth0 9000)",
             NetMtu);
-    net.Add("check-address", reads, Answer::One(address_columns), R"(Tells whether another host uses ADDRESS already:
-"free", or "used" with exit status 4. Only a host that answers a ping is noticed; the appliance's own address is free.
+    net.Add("check-address", reads, Answer::One(address_columns),
+            R"(Checks whether another host uses ADDRESS: "free", or
+"used" with exit status 4. It asks by ping and, when called by root, by ARP (RFC 5227), which hosts that answer no ping
+answer, too. The appliance's own address is free.
 
 tavoctl net check-address 192.0.2.20
 tavoctl net check-address --interface eth1 192.0.2.20)",
             NetCheckAddress);
+    net.Add("check-port", reads, Answer::One(port_columns), R"(Checks whether a program on this appliance uses a TCP or
+UDP port: "free", or "used" with exit status 4.
+
+tavoctl net check-port 5000)",
+            NetCheckPort);
     net.Add("refresh", changes, Answer::Change(), R"(Puts back what a program that died in the middle of a change has
 left, and brings the appliance's name in /etc/hosts up to date. Never waits: it leaves both to a program that is changing
 the network just now. The start of the network and the DHCP client's hook run it.

@@ -1,6 +1,7 @@
 // tavoctl net ipv6, wol, bond: what one card, or several together, can do.
 #include "frame/containers.h"
 #include "frame/failure.h"
+#include "network/net_card.h"
 #include "network/net_verbs.h"
 
 #include "tavo_net.h"

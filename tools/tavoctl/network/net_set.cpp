@@ -1,12 +1,12 @@
 // tavoctl net set: the address of an interface, on trial or for good.
 #include "frame/failure.h"
-#include "network/net_trial.h"
+#include "network/net_card.h"
+#include "network/net_change.h"
 #include "network/net_verbs.h"
 
 #include "tavo_net.h"
 
-#include <cstdio>
-#include <memory>
+#include <functional>
 
 namespace tavoctl {
 namespace {
@@ -55,66 +55,44 @@ void ChangeCard(const WantedNet &wanted, const TAVONETCARD &before)
 {
     const int result = TAVONetSetCard1(&wanted.card, before.szIp[0] ? &before : nullptr);
     Must(result == 0, std::string("give ") + wanted.card.szInterface + " the address " + wanted.text,
-         result == -2 ? "it has the address, but that is not stored" : "the old one stays");
+         result == -2 ? "it cannot be stored" : "");
     if (wanted.gateway)
-        Must(TAVONetDefaultGatewaySet(wanted.gateway->c_str()) == 0, "make " + *wanted.gateway + " the gateway",
-             "the address is set");
-}
-
-std::string AddressText(const TAVONETCARD &card)
-{
-    if (card.nMode == TAVO_NET_DHCP)
-        return "dhcp";
-    return card.szIp[0] ? std::string(card.szIp) + "/" + card.szMask : "";
-}
-
-void TryCard(const WantedNet &wanted, int seconds)
-{
-    NetTrial trial(wanted.card.szInterface, seconds);
-    try {
-        ChangeCard(wanted, trial.Before());
-    } catch (Failure &failure) {
-        failure.hint += std::string(failure.hint.empty() ? "" : "; ") +
-                        (trial.GiveUp() ? "the old settings are back" : "the old settings could not be put back");
-        throw;
-    }
-    trial.Begin();
-    if (!trial.IsKept())
-        throw Failure{.attempted = "keep the new settings",
-                      .reason = "they were not confirmed, the old ones are back",
-                      .status = exit_failed};
+        Must(TAVONetDefaultGatewaySet(wanted.gateway->c_str()) == 0, "make " + *wanted.gateway + " the gateway");
 }
 
 }  // namespace
 
 Action NetSet(Arguments &in)
 {
-    constexpr int64_t longest_trial = 86400;
     const auto interface = in.Option("--interface", "NAME", interface_kind, "which one (the first one)");
     const auto gateway = in.Option("--gateway", "ADDRESS", any_text, "the default gateway, too");
-    const auto seconds =
-        in.Number("--try", "SECONDS", "put the old settings back unless they are confirmed by then", 1, longest_trial);
+    const auto seconds = TrialOption(in);
+    const auto no_probe = in.Flag("--no-probe", no_probe_help);
     const auto address = in.Text("ADDRESS", any_text, "\"dhcp\", or an address with its mask");
     return [=](Call &call) {
-        const std::string attempted = "change the address";
         WantedNet wanted = {WantedCard(*address), *address, *gateway};
         if (*gateway && !BlTLIBIsIpAddr((*gateway)->c_str()))
             throw UsageFailure("make " + **gateway + " the gateway", "no host can have that address");
-        const std::string name = *interface ? **interface : std::string(FirstCard(attempted).szInterface);
-        CheckInterface(attempted, name);
+        const TAVONETCARD before = CardNamed("change the address", interface->value_or(""));
+        const std::string name = before.szInterface;
         Put(wanted.card.szInterface, name);
-        const TAVONETCARD before = NetSnapshot(name).Card();
         // What is stored may differ from what the kernel has, so that the change is made in any case.
         call.Change(name, "address", Maybe(AddressText(before)), AddressText(wanted.card));
         if (*gateway)
             call.Change("network", "gateway", {}, **gateway);
         if (call.dry_run)
             return;
-        if (*seconds)
-            TryCard(wanted, static_cast<int>(**seconds));
-        else
-            ChangeCard(wanted, before);
+        if (wanted.card.nMode == TAVO_NET_STATIC && !*no_probe)
+            RefuseUsedAddress(before, wanted.card.szIp);
+        NetChange::Make(*seconds, [&] { ChangeCard(wanted, before); });
     };
+}
+
+Given<std::optional<int64_t>> TrialOption(Arguments &in)
+{
+    constexpr int64_t longest_trial = 86400;
+    return in.Number("--try", "SECONDS", "put the old settings back unless they are confirmed by then", 1,
+                     longest_trial);
 }
 
 Action NetConfirm(Arguments &)
@@ -122,7 +100,7 @@ Action NetConfirm(Arguments &)
     return [](Call &call) {
         call.Change("network", "trial", "running", "kept");
         if (call.Proceed())
-            NetTrial::Confirm();
+            NetChange::Confirm();
     };
 }
 

@@ -3,7 +3,6 @@
 #define TAVOCTL_NET_VERBS_H
 
 #include "frame/verb.h"
-#include "network/net_snapshot.h"
 
 namespace tavoctl {
 
@@ -12,6 +11,11 @@ std::vector<std::string> InterfaceNames();
 
 extern const ArgumentKind interface_kind;
 inline constexpr char interface_help[] = "such as eth0";
+
+inline constexpr char no_probe_help[] = "do not ask by ARP first whether another host uses the address";
+
+// "--try SECONDS".
+Given<std::optional<int64_t>> TrialOption(Arguments &in);
 
 // Addresses, on trial or for good.
 Action NetSet(Arguments &in);

@@ -1,8 +1,9 @@
-// A change of the network on trial.
-#include "network/net_trial.h"
+// A change of the network that is kept or given up as a whole.
+#include "network/net_change.h"
 
 #include "frame/failure.h"
 
+#include "tavo_net.h"
 #include "tavo_proc.h"
 
 #include <algorithm>
@@ -28,7 +29,9 @@ namespace {
 constexpr const char *pid_file = "/var/run/tavo-net-trial.pid";
 constexpr int longest_change = 90;  // seconds: an old DHCP client to be killed, a new one to get a lease
 
-enum Word : char { begun = 'b', keep = 'k', give_up = 'g', kept = 'K', put_back = 'P', failed = 'F' };
+enum Word : char { begun = 'b', keep = 'k', give_up = 'g', kept = 'K', put_back = 'P', failed = 'F', refused = 'R' };
+
+constexpr char question[] = "try new settings";
 
 std::int64_t Now()  // milliseconds, also while the machine sleeps
 {
@@ -123,25 +126,35 @@ bool IsTooLate(int pid_fd, int signals)
     return !confirmed;
 }
 
-[[noreturn]] void Guard(const NetSnapshot &before, int pid_fd, int command, int seconds)
+// A program that the killed command left, or somebody else, may hold the lock of the network for a while.
+bool Insist(int (*end)())
+{
+    const std::int64_t until = Now() + 2 * longest_change * 1000ll;
+    while (end() != 0) {
+        if (TLIBErrGet() != ERR_LOCK_FAILED || Left(until) == 0)
+            return TLIBErrGet() == ERR_FILE_NOT_FOUND;  // somebody else was faster
+        ::sleep(1);
+    }
+    return true;
+}
+
+[[noreturn]] void Guard(int pid_fd, int command, int seconds)
 {
     const int signals = StandAlone();
-    Say(command, begun);
-    bool done = true;
-    const bool confirmed = IsConfirmed(command, signals, seconds) || !IsTooLate(pid_fd, signals);
-    if (!confirmed) {
-        // A program that the killed command left, or somebody else, may hold the lock for a while.
-        const std::int64_t until = Now() + 2 * longest_change * 1000ll;
-        while (!(done = before.PutBack()) && Left(until) > 0)
-            ::sleep(1);
-        // The last program of a killed command may have changed something after that.
-        if (IsGone(command)) {
-            ::sleep(1);
-            done = before.PutBack();
-        }
+    if (TAVONetCheckpointTake() != 0) {
+        const int code = TLIBErrGet();
+        Say(command, refused);
+        (void)!::send(command, &code, sizeof code, MSG_NOSIGNAL);
+        ::unlink(pid_file);
+        ::_exit(1);
     }
+    Say(command, begun);
+    const bool confirmed = IsConfirmed(command, signals, seconds) || !IsTooLate(pid_fd, signals);
+    if (!confirmed && IsGone(command))
+        ::sleep(1);  // its last program may still be changing something
+    const bool done = Insist(confirmed ? TAVONetCheckpointEnd : TAVONetCheckpointPutBack);
     ::unlink(pid_file);
-    Say(command, confirmed ? kept : done ? put_back : failed);
+    Say(command, !done ? failed : confirmed ? kept : put_back);
     ::_exit(0);
 }
 
@@ -155,7 +168,7 @@ int OpenPidFile()
         held.st_ino == named.st_ino)
         return fd;
     ::close(fd);
-    throw Failure{.attempted = "try new settings",
+    throw Failure{.attempted = question,
                   .reason = "others are on trial",
                   .hint = "tavoctl net confirm keeps them; or wait until they are given up",
                   .status = exit_busy};
@@ -170,15 +183,15 @@ void WritePid(int fd, pid_t pid)
 
 }  // namespace
 
-NetTrial::NetTrial(const std::string &interface, int seconds) : before_(interface), seconds_(seconds)
+NetChange::NetChange(int seconds) : seconds_(seconds)
 {
     const int pid_fd = OpenPidFile();
     int line[2];
     if (::socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, line) != 0)
-        throw Failure{.attempted = "try new settings", .reason = "no socket can be had"};
+        throw Failure{.attempted = question, .reason = "no socket can be had"};
     const pid_t pid = ::fork();
     if (pid < 0)
-        throw Failure{.attempted = "try new settings", .reason = "no process can be started"};
+        throw Failure{.attempted = question, .reason = "no process can be started"};
     if (pid == 0) {
         ::close(line[0]);
         try {
@@ -186,39 +199,65 @@ NetTrial::NetTrial(const std::string &interface, int seconds) : before_(interfac
         } catch (const Failure &) {
             ::_exit(1);
         }
-        Guard(before_, pid_fd, line[1], seconds);  // keeps the pid file locked
+        Guard(pid_fd, line[1], seconds);  // keeps the pid file locked
     }
     ::close(line[1]);
     ::close(pid_fd);
     guardian_ = line[0];
-    if (Hear(guardian_) != begun)
-        throw Failure{.attempted = "try new settings", .reason = "nobody would put the old ones back"};
+    const char word = Hear(guardian_);
+    if (word == begun)
+        return;
+    int code = 0;
+    if (word == refused && ::recv(guardian_, &code, sizeof code, MSG_WAITALL) == sizeof code)
+        TLIBErrSet(code);
+    ::close(guardian_);
+    throw LibraryFailure("note the old settings");
 }
 
-NetTrial::~NetTrial()
+NetChange::~NetChange()
 {
     if (guardian_ >= 0)
         ::close(guardian_);
 }
 
-void NetTrial::Begin()
+void NetChange::Make(const std::optional<int64_t> &seconds, const std::function<void()> &change)
+{
+    NetChange trial(static_cast<int>(seconds.value_or(0)));
+    try {
+        change();
+    } catch (Failure &failure) {
+        failure.hint += std::string(failure.hint.empty() ? "" : "; ") +
+                        (trial.GiveUp() ? "the old settings are back" : "the old settings could not be put back");
+        throw;
+    }
+    if (seconds)
+        trial.Begin();
+    else
+        Say(trial.guardian_, keep);
+    if (!trial.IsKept())
+        throw Failure{.attempted = "keep the new settings",
+                      .reason = "they were not confirmed, the old ones are back",
+                      .status = exit_failed};
+}
+
+void NetChange::Begin()
 {
     Say(guardian_, begun);
 }
 
-bool NetTrial::GiveUp()
+bool NetChange::GiveUp()
 {
     Say(guardian_, give_up);
     return Hear(guardian_) == put_back;
 }
 
-bool NetTrial::IsKept()
+bool NetChange::IsKept()
 {
-    const bool terminal = ::isatty(STDIN_FILENO) && ::isatty(STDERR_FILENO);
+    const bool asks = seconds_ > 0 && ::isatty(STDIN_FILENO) && ::isatty(STDERR_FILENO);
     const std::int64_t until = Now() + seconds_ * 1000ll;
-    if (terminal)
+    if (asks)
         std::cerr << "Keep the new settings? The old ones come back in " << seconds_ << " s. [y/N] " << std::flush;
-    pollfd ends[] = {{guardian_, POLLIN, 0}, {terminal ? STDIN_FILENO : -1, POLLIN, 0}};
+    pollfd ends[] = {{guardian_, POLLIN, 0}, {asks ? STDIN_FILENO : -1, POLLIN, 0}};
     while (Left(until) > 0) {
         if (::poll(ends, 2, Left(until)) <= 0)
             continue;
@@ -230,16 +269,16 @@ bool NetTrial::IsKept()
         break;
     }
     const char verdict = Hear(guardian_);
-    if (terminal && verdict != kept)
+    if (asks && verdict != kept)
         std::cerr << "\n";
     if (verdict == failed)
-        throw Failure{.attempted = "put the old settings back",
+        throw Failure{.attempted = seconds_ > 0 ? "put the old settings back" : "keep the new settings",
                       .reason = "the library refuses",
                       .hint = "tavoctl net show tells what is there now"};
     return verdict == kept;
 }
 
-void NetTrial::Confirm()
+void NetChange::Confirm()
 {
     if (TLIBProcSignalByPidFile(pid_file, SIGUSR1) != 0)
         throw Failure{.attempted = "keep the new settings",

@@ -1,0 +1,26 @@
+// A checkpoint of the whole network, which somebody takes for as long as he lives: /etc/network.checkpoint. When he has
+// died without an end of it, the network goes back to it.
+#ifndef TAVO_NETWORK_DETAIL_NETWORK_CHECKPOINT_H
+#define TAVO_NETWORK_DETAIL_NETWORK_CHECKPOINT_H
+
+#include "core/detail/where.h"
+
+namespace tavo {
+
+// Each is called under the network lock, and gives 0 or a code.
+
+// ERR_FILE_EXISTS: another process has one.
+int TakeNetworkCheckpoint(Where where = Where());
+
+// ERR_FILE_NOT_FOUND: there is none.
+int EndNetworkCheckpoint();
+
+// The same, with the network as it was. ERR_OP_FAILURE: an address could not be set.
+int PutBackNetworkCheckpoint();
+
+// Puts back one whose process is not there any more; after a restart of the system its files only.
+void PutBackAbandonedCheckpoint(Where where = Where());
+
+}  // namespace tavo
+
+#endif

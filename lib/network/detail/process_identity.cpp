@@ -1,0 +1,46 @@
+// A process that is still the same one.
+#include "network/detail/process_identity.h"
+
+#include "core/detail/process_list.h"
+#include "core/detail/text_fields.h"
+#include "network/detail/kernel_interface.h"
+
+#include <algorithm>
+#include <charconv>
+#include <csignal>
+
+#include <unistd.h>
+
+namespace tavo {
+
+std::string BeginningOf(pid_t pid)
+{
+    const std::string stat = ReadKernelFile(("/proc/" + std::to_string(pid) + "/stat").c_str()).value_or("");
+    const auto field = SplitFields(std::string_view(stat).substr(std::min(stat.rfind(')') + 1, stat.size())));
+    constexpr size_t start_time = 19;  // after the name
+    return field.size() > start_time ? std::string(field[start_time]) : "";
+}
+
+void EndProcess(pid_t pid, std::string_view beginning)
+{
+    if (pid <= 0 || beginning.empty() || BeginningOf(pid) != beginning)
+        return;
+    ::kill(pid, SIGKILL);
+    constexpr int rounds = 100;
+    for (int i = 0; i < rounds && BeginningOf(pid) == beginning && !IsZombie(pid); ++i)
+        ::usleep(10000);
+}
+
+pid_t ToPid(std::string_view text)
+{
+    pid_t pid = 0;
+    std::from_chars(text.data(), text.data() + text.size(), pid);
+    return pid;
+}
+
+std::string BootId()
+{
+    return ReadKernelFile("/proc/sys/kernel/random/boot_id").value_or("unknown\n");
+}
+
+}  // namespace tavo

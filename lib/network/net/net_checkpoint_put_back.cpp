@@ -1,0 +1,16 @@
+// Puts the whole network back as it was when its checkpoint was taken.
+#include "tavo_net.h"
+
+#include "core/detail/guard.h"
+#include "network/detail/network_change.h"
+#include "network/detail/network_checkpoint.h"
+
+extern "C" int TAVONetCheckpointPutBack(void)
+{
+    return Guard([] {
+        return tavo::ChangeNetwork([] {
+            const int code = tavo::PutBackNetworkCheckpoint();
+            return code == 0 ? 0 : Fail(code);
+        });
+    });
+}
