@@ -49,8 +49,16 @@ TEST(TavoctlStorage, WrongWordsRunNothing)
         {{"raid", "info", "md77"}, 3, "ERR_PATH_NOT_FOUND"},
         {{"raid", "stop", "--yes", "/dev/md77"}, 3, "ERR_PATH_NOT_FOUND"},
         {{"raid", "assemble", "md2", "1:2"}, 2, "ERR_BAD_PARAMETERS"},
+        {{"raid", "assemble"}, 2, "name an array, or say --all"},
+        {{"raid", "assemble", "--all", "md2"}, 2, "name an array, or say --all"},
+        {{"raid", "assemble", "--all", "--force"}, 2, "--all without --force"},
+        {{"raid", "assemble", "--force", "md2"}, 3, "raid list --all"},
+        {{"raid", "replace", "--yes", "md2", "sdd"}, 3, "ERR_PATH_NOT_FOUND"},
+        {{"raid", "scrub", "md2"}, 3, "ERR_PATH_NOT_FOUND"},
         {{"raid", "erase"}, 2, "name members"},
         {{"raid", "erase", "--yes", "--uuid", ":::"}, 2, "ERR_BAD_PARAMETERS"},
+        {{"volume", "create", "--yes", "one", "md2"}, 2, "a number from 1 on"},
+        {{"volume", "mount"}, 2, "name one, or say --all"},
         {{"lvm", "create", "--yes", "data", "md2"}, 2, "begins with vg"},
         {{"lvm", "rename", "vg1", "../vg2"}, 2, "begins with vg"},
     };
@@ -141,6 +149,52 @@ TEST(TavoctlStorage, VolumesAreListedAndChanged)
 
     scenario.Expect(vgs);
     EXPECT_EQ(Tavoctl({"lvm", "expand", "vg1"}).status, 3);
+}
+
+TEST(TavoctlStorage, AVolumeThatIsNotThereIsLookedForInEveryGroup)
+{
+    const Words list = {"/sbin/pvs", "--noheading", "-o", "pv_name,vg_name,vg_uuid,pv_count", "--separator", "|"};
+    const std::string pvs = "  /dev/md2|vg1|" + std::string(38, 'u') + "|1\n";
+    test::Scenario scenario;
+    for (const Words &words :
+         {Words{"volume", "mount", "7"}, {"volume", "unmount", "7"}, {"volume", "check", "7"}, {"volume", "grow", "7"}}) {
+        scenario.Expect(list).Prints(pvs);
+        const Ran ran = Tavoctl(words);
+        EXPECT_EQ(ran.status, 3) << testing::PrintToString(words) << ran;
+        EXPECT_THAT(ran.err, HasSubstr("there is no volume 7"));
+    }
+    // A group that is not active is listed; mounting it has the kernel know it first.
+    scenario.Expect(list).Prints(pvs);
+    const json volumes = test::Facts({"volume", "list", "--json"});
+    ASSERT_EQ(volumes.size(), 1u);
+    EXPECT_EQ(volumes[0].at("volume"), 1);
+    EXPECT_EQ(volumes[0].at("device"), "/dev/vg1/lv");
+    EXPECT_EQ(volumes[0].at("devices"), json({"md2"}));
+    EXPECT_EQ(volumes[0].at("active"), false);
+    EXPECT_EQ(volumes[0].at("path"), nullptr);
+    scenario.Expect(list).Prints(pvs);
+    scenario.Expect({"/sbin/vgchange", "-a", "y", "vg1"}).Prints("no such group\n").Exits(5);
+    const Ran ran = Tavoctl({"volume", "mount", "1"});
+    EXPECT_EQ(ran.status, 1);
+    EXPECT_THAT(ran.err, HasSubstr("cannot mount /dev/vg1/lv on /volume1: /sbin/vgchange: no such group"));
+    EXPECT_FALSE(std::filesystem::exists("/volume1"));
+}
+
+TEST(TavoctlStorage, EmptyBaysAreShown)
+{
+    test::Scenario scenario;
+    const json disks = test::Facts({"disk", "list", "--json"});
+    ASSERT_GE(disks.size(), 4u);
+    for (std::size_t bay = 0; bay < disks.size(); ++bay) {
+        EXPECT_EQ(disks[bay].at("bay"), std::to_string(bay + 1));
+        EXPECT_EQ(disks[bay].at("state"), "empty");
+        EXPECT_EQ(disks[bay].at("size"), nullptr);
+    }
+    scenario.ExpectAny("/sbin/pvs");
+    const json tree = test::Facts({"storage", "--json"});
+    ASSERT_EQ(tree.size(), disks.size());
+    EXPECT_EQ(tree[0].at("kind"), "bay");
+    EXPECT_EQ(tree[0].at("bay"), "1");
 }
 
 TEST(TavoctlStorage, SuperblocksAreATable)

@@ -3,21 +3,14 @@
 
 #include "account/user_record.h"
 #include "frame/failure.h"
-#include "frame/terminal_text.h"
 
 #include <algorithm>
 #include <cstdio>
 #include <fstream>
-#include <iostream>
 
 #include <strings.h>
 
 namespace tavoctl {
-
-void Warn(const std::string &text)
-{
-    std::cerr << "tavoctl: warning: " + Printable(text) + "\n";
-}
 
 void WarnOfName(const std::string &name)
 {

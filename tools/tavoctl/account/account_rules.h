@@ -7,9 +7,6 @@
 
 namespace tavoctl {
 
-// A line on standard error.
-void Warn(const std::string &text);
-
 // Digits only, blanks, and characters that may look like others.
 void WarnOfName(const std::string &name);
 

@@ -11,6 +11,7 @@
 
 #include <cerrno>
 #include <cstring>
+#include <iostream>
 #include <utility>
 #include <vector>
 
@@ -191,6 +192,11 @@ Failure UsageFailure(std::string attempted, std::string reason, std::string hint
 Failure NotFound(std::string attempted, int code, std::string hint)
 {
     return {.attempted = std::move(attempted), .hint = std::move(hint), .code = code, .status = exit_not_found};
+}
+
+void Warn(const std::string &text)
+{
+    std::cerr << "tavoctl: warning: " + Printable(text) + "\n";
 }
 
 }  // namespace tavoctl

@@ -58,6 +58,9 @@ Failure UsageFailure(std::string attempted, std::string reason, std::string hint
 // Something that was looked for and is not there; code is the library's name for that.
 Failure NotFound(std::string attempted, int code, std::string hint = {});
 
+// A line on standard error about what is done nevertheless, or left out.
+void Warn(const std::string &text);
+
 }  // namespace tavoctl
 
 #endif

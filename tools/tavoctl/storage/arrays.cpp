@@ -31,7 +31,7 @@ struct FreeList {
 
 std::optional<std::string> Attribute(const RAIDINFO &info, const std::string &name)
 {
-    return KernelText("/sys/block/" + DeviceName(info.szPath) + "/md/" + name);
+    return KernelText(ArrayFile(info.szPath, name));
 }
 
 std::string Duration(uint64_t seconds)
@@ -123,6 +123,8 @@ std::vector<std::string> ArrayNames()
 const char *StatusText(int status)
 {
     switch (status) {
+    case 0:
+        return "stopped";
     case RAID_STATUS_NORMAL:
         return "normal";
     case RAID_STATUS_DEGRADED:
@@ -156,6 +158,25 @@ std::vector<std::string> Members(const RAIDINFO &info, int states)
             paths.emplace_back(member->szPath);
     }
     return paths;
+}
+
+std::string MemberOf(const RAIDINFO &info, const std::string &word)
+{
+    const std::string path = DevicePath(word);
+    const std::vector<std::string> members = Members(info, ~0);
+    if (std::find(members.begin(), members.end(), path) != members.end())
+        return path;
+    if (std::isdigit(static_cast<unsigned char>(path.back())))
+        return "";
+    const auto part = std::find_if(members.begin(), members.end(), [&](const std::string &member) {
+        return member.starts_with(path) && member.find_first_not_of("0123456789", path.size()) == member.npos;
+    });
+    return part == members.end() ? "" : *part;
+}
+
+std::string ArrayFile(const std::string &path, const std::string &name)
+{
+    return "/sys/block/" + DeviceName(path) + "/md/" + name;
 }
 
 std::string ActionOf(const RAIDINFO &info)

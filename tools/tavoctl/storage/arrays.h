@@ -29,12 +29,18 @@ Array ReadArray(const std::string &path);
 std::vector<Array> ReadArrays();
 std::vector<std::string> ArrayNames();  // for completion
 
-const char *StatusText(int status);  // "degraded"
+const char *StatusText(int status);  // "degraded"; 0: "stopped"
 std::string LevelText(int level);    // "raid5"
 std::optional<int> LevelOf(const std::string &word);
 
 // The paths of the members in one of these states, RAID_MEMBER_ bits.
 std::vector<std::string> Members(const RAIDINFO &info, int states);
+
+// The member of an array that is, or is a partition of, the device that a word names; empty when none is.
+std::string MemberOf(const RAIDINFO &info, const std::string &word);
+
+// A file of the kernel's about an array, "/sys/block/md2/md/sync_action".
+std::string ArrayFile(const std::string &path, const std::string &name);
 
 // What the kernel does to an array: "recover", "resync", "reshape", "check"; empty when nothing.
 std::string ActionOf(const RAIDINFO &info);

@@ -5,17 +5,22 @@
 #include "frame/failure.h"
 #include "frame/suggestion.h"
 
+#include "tavo_appliance.h"
 #include "tavo_partition.h"
 
 #include <algorithm>
 #include <cctype>
 #include <cerrno>
+#include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
 #include <fstream>
 #include <memory>
 
+#include <fcntl.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 namespace tavoctl {
 namespace {
@@ -56,6 +61,36 @@ bool IsDiskName(const std::string &word)
     DISKPATH parsed;
     return IsDeviceName(word) && DiskPathParse(DevicePath(word).c_str(), &parsed) == 0 && parsed.nPartition == 0 &&
            !std::isdigit(static_cast<unsigned char>(word.back()));
+}
+
+// The number of the port that a disk hangs on: of ".../ata4/host3/target3:0:0/3:0:0:0" 4, of ".../0:0:3:0" 3.
+std::optional<int> PortOf(const std::string &name)
+{
+    std::error_code none;
+    const std::string place = std::filesystem::canonical("/sys/block/" + name + "/device", none);
+    if (const std::size_t ata = place.find("/ata"); ata != place.npos)
+        return std::atoi(place.c_str() + ata + 4);
+    int host, channel, target, unit;
+    const char *const last = place.c_str() + place.rfind('/') + 1;
+    return std::sscanf(last, "%d:%d:%d:%d", &host, &channel, &target, &unit) == 4 ? std::optional(target)
+                                                                                  : std::nullopt;
+}
+
+// The bays' ports have consecutive numbers: one disk that has its bay's name shows all of them.
+std::string BayOfPort(const std::string &disk)
+{
+    const auto port = PortOf(DeviceName(disk));
+    const auto name = [](int bay) {
+        return std::string("sd") + static_cast<char>('a' + bay - 1);
+    };
+    const int bays = TAVOMaxDiskGet();
+    for (int bay = 1; port && bay <= bays; ++bay) {
+        const auto other = PortOf(name(bay));
+        const int mine = other ? *port - *other + bay : 0;
+        if (mine >= 1 && mine <= bays && !PortOf(name(mine)))
+            return std::to_string(mine);
+    }
+    return "";
 }
 
 }  // namespace
@@ -128,7 +163,7 @@ std::string BayOf(const std::string &disk)
         return "";
     switch (container) {
     case DISK_CONTAINER_INTERNAL:
-        return std::to_string(parsed.iDisk);
+        return parsed.iDisk <= TAVOMaxDiskGet() ? std::to_string(parsed.iDisk) : BayOfPort(disk);
     case DISK_CONTAINER_UNIT:
         return std::to_string(parsed.iUnit) + "-" + std::to_string(parsed.iDisk);
     case DISK_CONTAINER_ESATA:
@@ -144,6 +179,12 @@ Power PowerOf(const std::string &disk)
     if (TAVOIDiskCheckPower(disk.c_str(), &state) != 0)
         return Power::unknown;
     return state == 0 ? Power::standby : Power::spinning;
+}
+
+bool Sleeps(const std::string &device)
+{
+    const std::string disk = device.substr(0, device.find_last_not_of("0123456789") + 1);
+    return disk.starts_with("/dev/sd") && PowerOf(disk) == Power::standby;
 }
 
 bool MayRead(const std::string &disk, bool wake)
@@ -179,6 +220,17 @@ std::optional<std::string> KernelText(const std::string &path)
     if (!std::getline(file, line))
         return std::nullopt;
     return line;
+}
+
+void SetKernelText(const std::string &path, const std::string &text, const std::string &attempted)
+{
+    const int fd = ::open(path.c_str(), O_WRONLY | O_CLOEXEC);
+    const bool written = fd >= 0 && ::write(fd, text.data(), text.size()) == static_cast<ssize_t>(text.size());
+    const int error = errno;
+    if (fd >= 0)
+        ::close(fd);
+    if (!written)
+        throw SystemFailure(attempted, error);
 }
 
 const ArgumentKind disk_kind = {

@@ -28,13 +28,17 @@ std::vector<std::string> DiskPaths();
 std::vector<std::string> DiskNames();    // for completion
 std::vector<std::string> DeviceNames();  // disks and partitions
 
-// "1" for an internal bay, "1-2" for a disk of an expansion unit, "usb", "esata".
+// "1" for an internal bay, "1-2" for a disk of an expansion unit, "usb", "esata". A disk that came while its bay's name
+// was still held has another one; its port says where it is. Empty where nothing does.
 std::string BayOf(const std::string &disk);
 
 enum class Power { spinning, standby, unknown };
 
 // Asking wakes no disk.
 Power PowerOf(const std::string &disk);
+
+// Whether a device is a disk, or a partition of one, that is in standby.
+bool Sleeps(const std::string &device);
 
 // A disk that does not tell may sleep.
 bool MayRead(const std::string &disk, bool wake);
@@ -48,6 +52,7 @@ void RefuseToWakeAny(bool wake, const std::string &attempted);
 struct Mount {
     std::string source;
     std::string place;
+    std::string type;  // "ext4"
 };
 
 // /proc/mounts.
@@ -61,6 +66,9 @@ void RefuseUsed(const std::vector<std::string> &devices, const std::string &atte
 
 // The first line of a file of the kernel's.
 std::optional<std::string> KernelText(const std::string &path);
+
+// Writes a setting of the kernel's; throws a Failure when it does not take it.
+void SetKernelText(const std::string &path, const std::string &text, const std::string &attempted);
 
 inline constexpr char disk_help[] = "its name, sda or /dev/sda";
 inline constexpr char member_help[] = "a partition or disk, sda3 or /dev/sda3";

@@ -72,7 +72,7 @@ std::vector<Mount> Mounts()
     for (std::string line; std::getline(file, line);) {
         Mount mount;
         std::istringstream words(line);
-        if (words >> mount.source >> mount.place)
+        if (words >> mount.source >> mount.place >> mount.type)
             mounts.push_back(mount);
     }
     return mounts;

@@ -4,33 +4,22 @@
 #include "frame/program.h"
 #include "storage/arrays.h"
 #include "storage/device.h"
+#include "storage/disk_facts.h"
 #include "storage/smart.h"
 
-#include "tavo_lvm.h"
-#include "tavo_partition.h"
 
 namespace tavoctl {
 namespace {
 
-// A disk, and what was found out without waking it.
-struct DiskFacts {
-    std::string path;
-    Power power;
-    bool asked;  // it may be read
-    std::optional<std::string> model, layout;
-    std::optional<Bytes> size;
-    std::optional<int> temperature;
-    std::vector<std::string> role;
-};
-
 constexpr Column<DiskFacts> disk_columns[] = {
-    {"bay", [](const DiskFacts &d) { return BayOf(d.path); }, "1 for an internal bay, 1-2 in a unit, usb, esata"},
+    {"bay", field<&DiskFacts::bay>, "1 for an internal bay, 1-2 in a unit, usb, esata, nvme"},
     {"disk",
      [](const DiskFacts &d) {
          return DeviceName(d.path);
      }},
     {"path", field<&DiskFacts::path>, "", in_details},
     {"model", field<&DiskFacts::model>},
+    {"serial", field<&DiskFacts::serial>, "as on the label of the disk"},
     {"size", field<&DiskFacts::size>},
     {"solid_state",
      [](const DiskFacts &d) {
@@ -39,18 +28,16 @@ constexpr Column<DiskFacts> disk_columns[] = {
      },
      "", in_one},
     {"temperature", field<&DiskFacts::temperature>, "", in_list, "degrees Celsius"},
-    {"state",
-     [](const DiskFacts &d) {
-         return Maybe(d.power == Power::unknown ? "" : d.power == Power::standby ? "standby" : "spinning");
-     },
-     "standby or spinning"},
+    {"state", [](const DiskFacts &d) { return d.State(); },
+     "standby or spinning; of a bay without a disk empty, or pulled while arrays still have it"},
+    {"health", field<&DiskFacts::health>, "of an NVMe disk", in_details},
     {"write_cache",
      [](const DiskFacts &d) {
          return d.asked ? std::optional(TAVODiskWriteCacheGet(d.path.c_str()) == 1) : std::nullopt;
      },
      "", in_one},
     {"layout", field<&DiskFacts::layout>, "of the system, or blank, or foreign"},
-    {"role", field<&DiskFacts::role>, "the arrays that it serves"},
+    {"role", field<&DiskFacts::role>, "the arrays that it serves, or that miss it"},
     {"use", [](const DiskFacts &d) { return Maybe(UseOf(d.path)); }, "why it must not be overwritten", in_one},
 };
 
@@ -103,45 +90,11 @@ constexpr Column<WipingJob> wiping_columns[] = {
      }},
 };
 
-std::optional<std::string> LayoutOf(const std::string &disk)
-{
-    int version = 0;
-    for (const int raid : {1, 0})
-        if (BlTAVOCheckPartitionLayout(disk.c_str(), raid, &version) == 1)
-            return "version " + std::to_string(version) + (raid ? "" : " plain");
-    int kind = 0;
-    if (PartitionTableTypeGet(disk.c_str(), &kind) != 0)
-        return {};
-    return kind == PARTITION_TABLE_NONE ? "blank" : "foreign";
-}
-
-DiskFacts DescribeDisk(const std::string &path, bool wake, const std::vector<Array> &arrays)
-{
-    DiskFacts disk = {path, PowerOf(path), wake, {}, {}, {}, {}, ArraysOf(arrays, path)};
-    disk.asked = wake || disk.power == Power::spinning;
-    char text[128];
-    if (TAVOLnxDiskGetModel(path.c_str(), text, sizeof text) == 0)
-        disk.model = std::string(text).substr(0, std::string(text).find_last_not_of(' ') + 1);
-    uint64_t sectors = 0;
-    if (DiskSizeGet(path.c_str(), &sectors) == 1)
-        disk.size = Bytes{sectors * 512};
-    if (!disk.asked)
-        return disk;
-    disk.layout = LayoutOf(path);
-    if (const int degrees = TAVODiskTemperatureGet(path.c_str()); degrees != -1)
-        disk.temperature = degrees;
-    return disk;
-}
-
 Action DiskList(Arguments &in)
 {
     const auto wake = in.Flag("--wake", wake_help);
     return [=](Call &call) {
-        const std::vector<Array> arrays = ReadArrays();
-        std::vector<DiskFacts> disks;
-        for (const std::string &path : DiskPaths())
-            disks.push_back(DescribeDisk(path, *wake, arrays));
-        call.List(disk_columns, disks);
+        call.List(disk_columns, AllDisks(*wake, ReadArrays()));
     };
 }
 
@@ -265,8 +218,8 @@ Action DiskCache(Arguments &in)
 void AddDisk(Program &program)
 {
     Family &disk = program.Add("disk", "Disks: what they are, their health and their power");
-    disk.Add("list", reads, Answer::List(disk_columns), R"(Lists the disks, those of the bays first, and the arrays that
-each serves. A disk in standby is not read, so its temperature and layout are not known.
+    disk.Add("list", reads, Answer::List(disk_columns), R"(Lists the bays with their disks, then other disks, and the
+arrays that each serves. A disk in standby is not read, so its temperature and layout are not known.
 
 tavoctl disk list
 tavoctl disk list --wake --json)",

@@ -2,13 +2,12 @@
 #include "families.h"
 #include "frame/containers.h"
 #include "frame/failure.h"
-#include "frame/folder_names.h"
 #include "frame/program.h"
 #include "storage/device.h"
+#include "storage/volume_groups.h"
 
 #include "tavo_lvm.h"
 
-#include <memory>
 #include <string_view>
 
 namespace tavoctl {
@@ -48,21 +47,6 @@ constexpr Column<PvFacts> pv_columns[] = {
     {"uuid", [](const PvFacts &p) { return Maybe(p.pv.szUuid); }, "of the group"},
 };
 
-struct FreeVolumes {
-    void operator()(LVMPVLIST *list) const { LVMPvSBListFree(list); }
-};
-
-std::vector<LVMPV> PhysicalVolumes()
-{
-    LVMPVLIST *list = nullptr;
-    Must(LVMPvSBEnum(&list) >= 0, "list the physical volumes", log_hint);
-    const std::unique_ptr<LVMPVLIST, FreeVolumes> owner(list);
-    std::vector<LVMPV> volumes;
-    for (const LVMPVLIST *node = list; node; node = node->pNext)
-        volumes.push_back(node->pv);
-    return volumes;
-}
-
 std::vector<std::string> VgNames()
 {
     std::vector<std::string> names;
@@ -99,32 +83,6 @@ constexpr ArgumentKind vg_kind = {
     .wrong = "data",
 };
 
-void RefuseWithoutLvm(const std::string &attempted)
-{
-    if (LVMIsSupport() != 1)
-        throw Failure{.attempted = attempted, .reason = "this model has no RAID and no volumes"};
-}
-
-// Throws a Failure when there is no such group.
-LVMVG ReadVg(const std::string &path, const std::string &attempted)
-{
-    RefuseWithoutLvm(attempted);
-    LVMVG group;
-    const int found = LVMVgSBGet(path.c_str(), &group);
-    Must(found >= 0, attempted, log_hint);
-    if (found == 0)
-        throw NotFound(attempted, ERR_NO_VOLUME_ID, "tavoctl lvm list shows what is there");
-    return group;
-}
-
-// Throws a Failure when a volume of the group is in use.
-void RefuseUsedGroup(const std::string &path, const std::string &attempted)
-{
-    for (const std::string &volume : FolderNames(path))
-        if (const std::string use = UseOf(path + '/' + volume); !use.empty())
-            throw BusyFailure(attempted, use, "free it first");
-}
-
 Action LvmList(Arguments &in)
 {
     const auto wake = in.Flag("--wake", "read them although that wakes a disk");
@@ -154,10 +112,7 @@ Action LvmCreate(Arguments &in)
         if (LVMVgSBGet(path.c_str(), &present) == 1)
             throw Failure{.attempted = attempted, .reason = "it is there already"};
         RefuseUsed(paths, attempted);
-        for (const LVMPV &pv : PhysicalVolumes())
-            for (const std::string &device : paths)
-                if (*pv.szVg && device == pv.szPv)
-                    throw BusyFailure(attempted, device + " belongs to " + pv.szVg, "remove that first");
+        RefuseGrouped(paths, attempted);
         call.Change(path, "devices", {}, paths);
         call.Change(path, "volume", {}, volume->value_or("lv"));
         if (call.Proceed("Lose what is on " + Joined(paths, ", ") + "?"))
@@ -173,10 +128,7 @@ Action LvmRemove(Arguments &in)
         const std::string path = VgPath(*group);
         const std::string attempted = "remove the volume group " + path;
         ReadVg(path, attempted);
-        std::vector<std::string> devices;
-        for (const LVMPV &pv : PhysicalVolumes())
-            if (path == pv.szVg)
-                devices.emplace_back(pv.szPv);
+        const std::vector<std::string> devices = DevicesOf(path);
         RefuseUsedGroup(path, attempted);
         call.Change(path, "devices", devices, {});
         if (!call.Proceed("Lose " + path + " and what is on it?"))
@@ -208,11 +160,7 @@ Action LvmExpand(Arguments &in)
     return [=](Call &call) {
         const std::string path = VgPath(*group);
         const std::string attempted = "expand the volume group " + path;
-        const LVMVG found = ReadVg(path, attempted);
-        const std::unique_ptr<LVMVGINFO, void (*)(LVMVGINFO *)> record(LVMVgInfoAlloc(), LVMVgInfoFree);
-        Must(record && LVMVgSB2Info(&found, record.get()) == 0, attempted, log_hint);
-        if (record->nPv == 0)
-            throw Failure{.attempted = attempted, .reason = "it has no physical volumes"};
+        const VolumeGroup record = ReadVgInfo(path, attempted);
         call.Change(path, "size", {}, "the whole of its devices");
         if (call.Proceed())
             Must(LVMPvExpand(record.get()) == 0, attempted, log_hint);

@@ -208,13 +208,14 @@ system a disk carries. Without DISK: every layout there has been, in sectors of 
 tavoctl partition layout sda
 tavoctl partition layout)",
                   PartitionLayout);
-    partition.Add("create", changes | destroys, Answer::Change(), R"(Makes the system's partitions on a disk. --system
-makes partitions 1 and 2, on an empty table, so that a data partition is gone too; --data partition 3, in a second call.
-What is on the disk is lost. A disk that is in use is refused.
+    partition.Add("create", changes | destroys, Answer::Change(), R"(Makes the system's partitions on disks: 1 and 2 for
+the system, on an empty table, and 3 for data. --system and --data make these alone; --system also loses a data
+partition. What is on the disks is lost. A disk that is in use is refused.
 
-tavoctl partition create --system sdb
-tavoctl partition create --yes --data sdb
-tavoctl partition create --system --version 6 sdb)",
+tavoctl partition create sdb
+tavoctl partition create --yes sda sdb sdc sdd
+tavoctl partition create --system --version 6 sdb
+tavoctl partition create --yes --data sdb)",
                   PartitionMake);
     partition.Add("clean", changes | destroys, Answer::Change(),
                   R"(Empties entries of a disk's partition table and erases

@@ -54,27 +54,44 @@ std::vector<std::string> DataPartitions(const std::string &disk)
 
 Action PartitionMake(Arguments &in)
 {
-    const auto disk = in.Text("DISK", disk_kind, disk_help);
-    const auto system = in.Flag("--system", "partitions 1 and 2, on an empty table");
-    const auto data = in.Flag("--data", "partition 3");
+    const auto words = in.Texts("DISK", disk_kind, disk_help);
+    const auto system = in.Flag("--system", "partitions 1 and 2 alone, on an empty table");
+    const auto data = in.Flag("--data", "partition 3 alone");
     const auto version =
         in.Number("--version", "VERSION", "of the layout; 0: the one that the system carries (0)", 0, 99);
     return [=](Call &call) {
-        const std::string path = DiskPath(*disk);
-        const std::string attempted = "make partitions on " + path;
-        const int flags = FlagsOf(*system, *data, attempted);
+        std::vector<std::string> paths;
+        for (const std::string &word : *words)
+            paths.push_back(DiskPath(word));
+        const std::string attempted = "make partitions on " + Joined(paths, ", ");
+        // In one call for both the second would undo the first.
+        std::vector<int> steps;
+        if (*system || !*data)
+            steps.push_back(PARTITION_SYSTEM);
+        if (*data || !*system)
+            steps.push_back(PARTITION_DATA);
         int layout = static_cast<int>(version->value_or(0));
         if (TAVOPartitionLayoutIdxGet(layout, LVMIsSupport()) < 0)
             throw UsageFailure(attempted, "there is no layout of version " + std::to_string(layout),
                                "tavoctl partition layout shows them");
         // Partition 3 is made after the others, which may be in use.
-        if (flags == PARTITION_SYSTEM)
-            RefuseUsed({path}, attempted);
-        else if (PartitionsOf(path).size() > 2)
-            throw Failure{.attempted = attempted, .reason = "there is a data partition", .hint = "clean it first"};
-        call.Change(path, "partitions", PartitionsOf(path), flags == PARTITION_SYSTEM ? "1, 2" : "3");
-        if (call.Proceed(flags == PARTITION_SYSTEM ? "Lose all partitions of " + path + "?" : "Make " + path + "3?"))
-            Must(PartitionCreate(path.c_str(), flags, layout ? &layout : nullptr) == 0, attempted, log_hint);
+        const bool empties = steps[0] == PARTITION_SYSTEM;
+        if (empties)
+            RefuseUsed(paths, attempted);
+        for (const std::string &path : paths) {
+            if (!empties && PartitionsOf(path).size() > 2)
+                throw Failure{.attempted = attempted,
+                              .reason = path + " has a data partition",
+                              .hint = "clean it first"};
+            call.Change(path, "partitions", PartitionsOf(path), !empties ? "3" : steps.size() > 1 ? "1, 2, 3" : "1, 2");
+        }
+        const std::string all = Joined(paths, ", ");
+        if (!call.Proceed(empties ? "Lose all partitions of " + all + "?" : "Make partition 3 of " + all + "?"))
+            return;
+        for (const std::string &path : paths)
+            for (const int step : steps)
+                Must(PartitionCreate(path.c_str(), step, layout ? &layout : nullptr) == 0,
+                     "make partitions on " + path, log_hint);
     };
 }
 

@@ -3,34 +3,30 @@
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/program.h"
-#include "frame/progress.h"
 #include "storage/arrays.h"
 #include "storage/device.h"
 #include "storage/raid_verbs.h"
+#include "storage/stopped_arrays.h"
 
 #include <algorithm>
-#include <chrono>
 #include <cstdlib>
-#include <thread>
+#include <sstream>
 
 namespace tavoctl {
 namespace {
 
-// An array as the kernel has it; whether its disks may be woken for the rest.
+// An array as the kernel has it, or as its members have it when it does not run; whether its disks may be woken for the
+// rest.
 struct ArrayFacts {
     std::shared_ptr<const RAIDINFO> info;
     bool wake;
+    std::optional<std::string> uuid;  // where it is known
 };
-
-// Whether the disk of a member is in standby.
-bool Sleeps(const std::string &member)
-{
-    const std::string disk = member.substr(0, member.find_last_not_of("0123456789") + 1);
-    return disk.starts_with("/dev/sd") && PowerOf(disk) == Power::standby;
-}
 
 std::optional<std::string> UuidOf(const ArrayFacts &array)
 {
+    if (array.uuid)
+        return array.uuid;
     const std::vector<std::string> members = Members(*array.info, ~0);
     const bool reads_all = std::all_of(members.begin(), members.end(),
                                        [&](const std::string &path) { return array.wake || !Sleeps(path); });
@@ -38,6 +34,14 @@ std::optional<std::string> UuidOf(const ArrayFacts &array)
     if (!reads_all || RAIDUUIDGet(array.info->szPath, uuid, sizeof uuid) != 1)
         return {};
     return uuid;
+}
+
+// The number that a file of the kernel's about an array begins with: "200000 (system)".
+std::optional<int64_t> SettingOf(const ArrayFacts &array, const char *name)
+{
+    std::istringstream text(KernelText(ArrayFile(array.info->szPath, name)).value_or(""));
+    int64_t number = 0;
+    return text >> number ? std::optional(number) : std::nullopt;
 }
 
 template <int states>
@@ -56,11 +60,8 @@ constexpr Column<ArrayFacts> array_columns[] = {
          return LevelText(a.info->fLevel);
      }},
     {"status", [](const ArrayFacts &a) -> std::string { return StatusText(a.info->nStatus); },
-     "normal, degraded or crashed"},
-    {"size",
-     [](const ArrayFacts &a) {
-         return Bytes{a.info->cbArray};
-     }},
+     "normal, degraded or crashed; stopped: it does not run"},
+    {"size", [](const ArrayFacts &a) { return a.info->cbArray ? std::optional(Bytes{a.info->cbArray}) : std::nullopt; }},
     {"member_size",
      [](const ArrayFacts &a) { return a.info->cbMember ? std::optional(Bytes{a.info->cbMember}) : std::nullopt; },
      "what is used of each member", in_details},
@@ -105,6 +106,12 @@ constexpr Column<ArrayFacts> array_columns[] = {
                     : std::nullopt;
      },
      "", in_details},
+    {"mismatches", [](const ArrayFacts &a) { return SettingOf(a, "mismatch_cnt"); },
+     "sectors that the last scrub found not to match", in_details},
+    {"least_speed", [](const ArrayFacts &a) { return SettingOf(a, "sync_speed_min"); },
+     "that a rebuild keeps up beside other work", in_details, "KiB a second"},
+    {"most_speed", [](const ArrayFacts &a) { return SettingOf(a, "sync_speed_max"); }, "of a rebuild", in_details,
+     "KiB a second"},
     {"uuid", [](const ArrayFacts &a) { return UuidOf(a); }, "", in_one},
     {"use", [](const ArrayFacts &a) { return Maybe(UseOf(a.info->szPath)); }, "why it must not be stopped", in_one},
 };
@@ -138,12 +145,17 @@ constexpr Column<RAIDSBENTRY> superblock_columns[] = {
      }},
 };
 
-Action RaidList(Arguments &)
+Action RaidList(Arguments &in)
 {
-    return [](Call &call) {
+    const auto all = in.Flag("--all", "also those that do not run; this reads every disk");
+    const auto wake = in.Flag("--wake", "with --all: read the disks although that wakes them");
+    return [=](Call &call) {
         std::vector<ArrayFacts> arrays;
         for (Array &array : ReadArrays())
-            arrays.push_back({std::move(array), false});
+            arrays.push_back({std::move(array), *wake, {}});
+        if (*all)
+            for (const StoppedArray &array : StoppedArrays(*wake))
+                arrays.push_back({array.Record(), *wake, array.uuid});
         call.List(array_columns, arrays);
     };
 }
@@ -153,44 +165,7 @@ Action RaidInfo(Arguments &in)
     const auto word = in.Text("ARRAY", array_kind, array_help);
     const auto wake = in.Flag("--wake", "read the UUID although that wakes a disk");
     return [=](Call &call) {
-        call.One(array_columns, ArrayFacts{ReadArray(ArrayPath(*word)), *wake});
-    };
-}
-
-using Clock = std::chrono::steady_clock;
-
-// Until the array is not rebuilt any more; a time limit of 0 seconds is none.
-void WaitFor(const std::string &path, Clock::time_point start, int64_t timeout)
-{
-    constexpr int most_quiet = 10;
-    const std::string attempted = "wait for " + path;
-    Progress progress(DeviceName(path));
-    int quiet = 0;  // rounds in which nothing went on
-    for (;; std::this_thread::sleep_for(std::chrono::seconds(1))) {
-        const Array array = ReadArray(path);
-        const bool busy = array->fRebuilding != 0;
-        quiet = busy ? 0 : quiet + 1;
-        if (!busy && array->nStatus == RAID_STATUS_NORMAL)
-            return;
-        // A spare that has just come is rebuilt onto after a moment.
-        const bool begins = array->nStatus == RAID_STATUS_DEGRADED && !Members(*array, RAID_MEMBER_SPARE).empty();
-        if (!busy && !(begins && quiet < most_quiet))
-            throw Failure{.attempted = attempted, .reason = std::string("it is ") + StatusText(array->nStatus)};
-        if (timeout > 0 && Clock::now() - start >= std::chrono::seconds(timeout))
-            throw BusyFailure(attempted, "the time is up");
-        const auto rebuild = RebuildOf(*array);
-        progress.Show(ActionOf(*array) + " " + (rebuild ? rebuild->Text() : "begins"));
-    }
-}
-
-Action RaidWait(Arguments &in)
-{
-    const auto words = in.Texts("ARRAY", array_kind, array_help);
-    const auto timeout = in.Number("--timeout", "SECONDS", "give up after so long; 0: never (0)");
-    return [=](Call &) {
-        const Clock::time_point start = Clock::now();
-        for (const std::string &word : *words)
-            WaitFor(ArrayPath(word), start, timeout->value_or(0));
+        call.One(array_columns, ArrayFacts{ReadArray(ArrayPath(*word)), *wake, {}});
     };
 }
 
@@ -224,9 +199,10 @@ void AddRaid(Program &program)
 {
     Family &raid = program.Add("raid", "Arrays of disks");
     raid.Add("list", reads, Answer::List(array_columns), R"(Lists the arrays that run: their health, and how far a
-rebuild has come, in percent. No disk is read.
+rebuild has come, in percent. No disk is read. --all also lists those that do not run, from what their members say.
 
-tavoctl raid list)",
+tavoctl raid list
+tavoctl raid list --all --output array,status,members,uuid)",
              RaidList);
     raid.Add("info", reads, Answer::One(array_columns), R"(Shows what is known of an array. A member is active (in
 sync), spare (or being rebuilt), failed, or fatal: failed, and the array with it.
@@ -268,11 +244,39 @@ tavoctl raid migrate md2 sde3)",
 
 tavoctl raid stop md2)",
              RaidHalt);
-    raid.Add("assemble", changes, Answer::Change(), R"(Starts an array from the members that carry its UUID, as `raid
-superblock` shows it.
+    raid.Add("assemble", changes | destroys, Answer::Change(),
+             R"(Starts an array from the members that carry its UUID; without
+UUID, the one that its members call ARRAY. --all starts all that do not run, says why one is not started, and ends with
+status 1 then. What is started this way is in order, or degraded and known to be whole. --force also starts an array
+whose members disagree after a power failure: it shows how far each member has come and what may be lost, and asks.
 
-tavoctl raid assemble md2 495e879a:4e806313:a484c744:9c844bd2)",
+tavoctl raid assemble --all
+tavoctl raid assemble md2
+tavoctl raid assemble md2 495e879a:4e806313:a484c744:9c844bd2
+tavoctl raid assemble --force md2)",
              RaidStart);
+    raid.Add("replace", changes | destroys, Answer::Change(), R"(Puts a new disk into the place of a member. The last DISK
+is the new one; before it stands the member that goes, which may be left out when only one has failed or was pulled. The
+new disk gets the partitions that the other members' disks have, and the array is rebuilt onto it; what was on it is
+lost. A disk that serves several arrays is replaced in each. One that is in use or too small is refused.
+
+tavoctl raid replace md2 sdd
+tavoctl raid replace --yes --wait md2 sdb3 sdd)",
+             RaidReplace);
+    raid.Add("scrub", changes, Answer::Change(), R"(Compares the members of an array with each other in the background.
+Sectors that cannot be read are written again from the other members; how many do not match is shown by `raid info`,
+and with --wait when it has ended.
+
+tavoctl raid scrub md2
+tavoctl raid scrub --wait md2
+tavoctl raid scrub --stop md2)",
+             RaidScrub);
+    raid.Add("speed", changes, Answer::Change(), R"(Sets how fast an array is rebuilt or scrubbed, until it is stopped.
+The speed is that of each member.
+
+tavoctl raid speed --least 20000 --most 100000 md2
+tavoctl raid speed --most 0 md2)",
+             RaidSpeed);
     raid.Add("erase", changes | destroys, Answer::Change(), R"(Erases the RAID superblocks of MEMBERs, or with --uuid
 those of every disk and partition that belongs to that array. What is in use is refused.
 

@@ -169,18 +169,6 @@ Action RaidHalt(Arguments &in)
     };
 }
 
-Action RaidStart(Arguments &in)
-{
-    const auto word = in.Text("ARRAY", array_kind, array_help);
-    const auto uuid = in.Text("UUID", any_text, "of the array");
-    return [=](Call &call) {
-        const std::string path = ArrayPath(*word);
-        call.Change(path, "status", {}, "running");
-        if (call.Proceed())
-            Must(RAIDAssemble(path.c_str(), uuid->c_str()) == 0, "start " + path, HintFor{ERR_SUCCESS, log_hint});
-    };
-}
-
 Action RaidErase(Arguments &in)
 {
     const auto words = in.Texts("MEMBER", device_kind, member_help, 0);

@@ -2,6 +2,7 @@ if machine; then
     say 'A volume group on the array, and the volume that fills it'
     run tavoctl lvm create --yes vg1 md2
     run tavoctl lvm list
+    run tavoctl lvm remove --yes vg1
 else
     say 'Volume groups, as the scripted tools tell of them'
     scenario begin

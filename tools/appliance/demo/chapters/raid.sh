@@ -7,12 +7,9 @@ if machine; then
     run appliance-event pull 3
     echo x >/dev/md2
     run tavoctl raid list
-    mdadm --quiet /dev/md2 --fail detached --remove detached
     run appliance-event plug 3 --blank 4736
-    tavoctl partition create --yes --system sdc
-    tavoctl partition create --yes --data sdc
-    run tavoctl raid add --yes md2 sdc3
-    run tavoctl raid wait md2
+    new=$(tavoctl disk list --noheadings --output bay,disk | awk '$1 == 3 { print $2 }')
+    run tavoctl raid replace --yes --wait md2 "$new"
     run tavoctl raid info md2
 else
     say 'Arrays: mdadm is scripted here; what it says of two members is read all the same'
