@@ -28,8 +28,8 @@ AddFamily AddVersion;
 
 // In the order of the help text.
 inline constexpr AddFamily *families[] = {
-    AddConf, AddSection, AddLock, AddProc,  AddStorage, AddVolume,   AddDisk,    AddPartition, AddRaid,
-    AddLvm,  AddUser,    AddGroup, AddQuota, AddNet,    AddDiscover, AddService, AddError,     AddVersion,
+    AddConf, AddSection, AddLock,  AddProc,  AddStorage, AddVolume,   AddDisk,    AddPartition, AddRaid,
+    AddLvm,  AddUser,    AddGroup, AddQuota, AddNet,     AddDiscover, AddService, AddError,     AddVersion,
 };
 
 }  // namespace tavoctl

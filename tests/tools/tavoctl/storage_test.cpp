@@ -156,8 +156,10 @@ TEST(TavoctlStorage, AVolumeThatIsNotThereIsLookedForInEveryGroup)
     const Words list = {"/sbin/pvs", "--noheading", "-o", "pv_name,vg_name,vg_uuid,pv_count", "--separator", "|"};
     const std::string pvs = "  /dev/md2|vg1|" + std::string(38, 'u') + "|1\n";
     test::Scenario scenario;
-    for (const Words &words :
-         {Words{"volume", "mount", "7"}, {"volume", "unmount", "7"}, {"volume", "check", "7"}, {"volume", "grow", "7"}}) {
+    for (const Words &words : {Words{"volume", "mount", "7"},
+                               {"volume", "unmount", "7"},
+                               {"volume", "check", "7"},
+                               {"volume", "grow", "7"}}) {
         scenario.Expect(list).Prints(pvs);
         const Ran ran = Tavoctl(words);
         EXPECT_EQ(ran.status, 3) << testing::PrintToString(words) << ran;

@@ -7,7 +7,6 @@
 #include "storage/disk_facts.h"
 #include "storage/smart.h"
 
-
 namespace tavoctl {
 namespace {
 

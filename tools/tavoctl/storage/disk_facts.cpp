@@ -89,9 +89,8 @@ std::vector<DiskFacts> AllDisks(bool wake, const std::vector<Array> &arrays)
     for (int bay = 1; bay <= TAVOMaxDiskGet(); ++bay) {
         if (TAVOEBoxDevIs(bay - 1) == 1)
             continue;
-        const auto here = std::find_if(disks.begin(), disks.end(), [&](const DiskFacts &disk) {
-            return disk.bay == std::to_string(bay);
-        });
+        const auto here = std::find_if(disks.begin(), disks.end(),
+                                       [&](const DiskFacts &disk) { return disk.bay == std::to_string(bay); });
         if (here != disks.end()) {
             sorted.push_back(std::move(*here));
             disks.erase(here);

@@ -49,8 +49,11 @@ std::optional<NvmeHealth> ParseNvmeHealth(const unsigned char (&page)[page_size]
         int bit;
         const char *text;
     } warnings[] = {
-        {0x01, "its spare blocks run out"},  {0x02, "it is too hot or too cold"}, {0x04, "it is no longer reliable"},
-        {0x08, "it can only be read"},       {0x10, "its cache is not saved when the power fails"},
+        {0x01, "its spare blocks run out"},
+        {0x02, "it is too hot or too cold"},
+        {0x04, "it is no longer reliable"},
+        {0x08, "it can only be read"},
+        {0x10, "its cache is not saved when the power fails"},
     };
     const int kelvin = page[1] | page[2] << 8;
     if (kelvin == 0)
@@ -68,9 +71,12 @@ std::vector<NvmeDisk> NvmeDisks()
         if (!name.starts_with("nvme"))
             continue;
         const std::string block = "/sys/block/" + name;
-        NvmeDisk disk = {name, WithoutBlanks(KernelText(block + "/device/model").value_or("")),
+        NvmeDisk disk = {name,
+                         WithoutBlanks(KernelText(block + "/device/model").value_or("")),
                          WithoutBlanks(KernelText(block + "/device/serial").value_or("")),
-                         std::stoull(KernelText(block + "/size").value_or("0")) * 512, {}, {}};
+                         std::stoull(KernelText(block + "/size").value_or("0")) * 512,
+                         {},
+                         {}};
         unsigned char page[page_size] = {};
         if (ReadHealthPage("/dev/" + name, page))
             if (const auto health = ParseNvmeHealth(page)) {
@@ -79,7 +85,8 @@ std::vector<NvmeDisk> NvmeDisks()
             }
         disks.push_back(std::move(disk));
     }
-    std::sort(disks.begin(), disks.end(), [](const NvmeDisk &left, const NvmeDisk &right) { return left.name < right.name; });
+    std::sort(disks.begin(), disks.end(),
+              [](const NvmeDisk &left, const NvmeDisk &right) { return left.name < right.name; });
     return disks;
 }
 

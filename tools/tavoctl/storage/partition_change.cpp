@@ -80,9 +80,8 @@ Action PartitionMake(Arguments &in)
             RefuseUsed(paths, attempted);
         for (const std::string &path : paths) {
             if (!empties && PartitionsOf(path).size() > 2)
-                throw Failure{.attempted = attempted,
-                              .reason = path + " has a data partition",
-                              .hint = "clean it first"};
+                throw Failure{
+                    .attempted = attempted, .reason = path + " has a data partition", .hint = "clean it first"};
             call.Change(path, "partitions", PartitionsOf(path), !empties ? "3" : steps.size() > 1 ? "1, 2, 3" : "1, 2");
         }
         const std::string all = Joined(paths, ", ");
@@ -90,8 +89,8 @@ Action PartitionMake(Arguments &in)
             return;
         for (const std::string &path : paths)
             for (const int step : steps)
-                Must(PartitionCreate(path.c_str(), step, layout ? &layout : nullptr) == 0,
-                     "make partitions on " + path, log_hint);
+                Must(PartitionCreate(path.c_str(), step, layout ? &layout : nullptr) == 0, "make partitions on " + path,
+                     log_hint);
     };
 }
 

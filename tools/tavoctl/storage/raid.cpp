@@ -61,7 +61,10 @@ constexpr Column<ArrayFacts> array_columns[] = {
      }},
     {"status", [](const ArrayFacts &a) -> std::string { return StatusText(a.info->nStatus); },
      "normal, degraded or crashed; stopped: it does not run"},
-    {"size", [](const ArrayFacts &a) { return a.info->cbArray ? std::optional(Bytes{a.info->cbArray}) : std::nullopt; }},
+    {"size",
+     [](const ArrayFacts &a) {
+         return a.info->cbArray ? std::optional(Bytes{a.info->cbArray}) : std::nullopt;
+     }},
     {"member_size",
      [](const ArrayFacts &a) { return a.info->cbMember ? std::optional(Bytes{a.info->cbMember}) : std::nullopt; },
      "what is used of each member", in_details},
@@ -255,7 +258,8 @@ tavoctl raid assemble md2
 tavoctl raid assemble md2 495e879a:4e806313:a484c744:9c844bd2
 tavoctl raid assemble --force md2)",
              RaidStart);
-    raid.Add("replace", changes | destroys, Answer::Change(), R"(Puts a new disk into the place of a member. The last DISK
+    raid.Add("replace", changes | destroys, Answer::Change(),
+             R"(Puts a new disk into the place of a member. The last DISK
 is the new one; before it stands the member that goes, which may be left out when only one has failed or was pulled. The
 new disk gets the partitions that the other members' disks have, and the array is rebuilt onto it; what was on it is
 lost. A disk that serves several arrays is replaced in each. One that is in use or too small is refused.

@@ -85,7 +85,8 @@ Action RaidScrub(Arguments &in)
         if (*stop && *wait)
             throw UsageFailure(attempted, "--stop excludes --wait");
         if ((array->fLevel & (RAID_LEVEL_0 | RAID_LEVEL_LINEAR)) != 0)
-            throw Failure{.attempted = attempted, .reason = "a " + LevelText(array->fLevel) + " has nothing to compare"};
+            throw Failure{.attempted = attempted,
+                          .reason = "a " + LevelText(array->fLevel) + " has nothing to compare"};
         const bool runs = action == "check";
         if (!*stop && !runs && !action.empty())
             throw BusyFailure(attempted, "it is being rebuilt (" + action + ")", "tavoctl raid wait waits for the end");
@@ -119,8 +120,12 @@ Action RaidSpeed(Arguments &in)
             const char *column, *file;
             std::optional<int64_t> wanted;
         } settings[] = {{"least_speed", "sync_speed_min", *least}, {"most_speed", "sync_speed_max", *most}};
-        const auto file = [&](const auto &setting) { return ArrayFile(array->szPath, setting.file); };
-        const auto text = [](int64_t wanted) { return wanted ? std::to_string(wanted) : "system"; };
+        const auto file = [&](const auto &setting) {
+            return ArrayFile(array->szPath, setting.file);
+        };
+        const auto text = [](int64_t wanted) {
+            return wanted ? std::to_string(wanted) : "system";
+        };
         for (const auto &setting : settings) {
             // "200000 (system)", "1000 (local)"
             const std::string now = KernelText(file(setting)).value_or("");

@@ -34,8 +34,8 @@ void TakeIn(std::vector<StoppedArray> &arrays, const std::string &path, const RA
     auto array = std::find_if(arrays.begin(), arrays.end(),
                               [&](const StoppedArray &known) { return known.uuid == superblock.szUuid; });
     if (array == arrays.end())
-        array = arrays.insert(
-            arrays.end(), {superblock.szArray, superblock.szUuid, superblock.fLevel, superblock.nMember, {}});
+        array = arrays.insert(arrays.end(),
+                              {superblock.szArray, superblock.szUuid, superblock.fLevel, superblock.nMember, {}});
     array->members.push_back({path, superblock.iRole, superblock.nEvent});
 }
 
@@ -84,7 +84,7 @@ std::shared_ptr<const RAIDINFO> StoppedArray::Record() const
     RAIDMEMBER **end = &info->pMembers;
     for (const StoppedMember &member : members) {
         *end = new RAIDMEMBER();
-        std::snprintf((*end)->szPath, sizeof (*end)->szPath, "%s", member.path.c_str());
+        std::snprintf((*end)->szPath, sizeof(*end)->szPath, "%s", member.path.c_str());
         (*end)->nState = member.slot < 0 ? RAID_MEMBER_SPARE : RAID_MEMBER_ACTIVE;
         end = &(*end)->pNext;
     }

@@ -207,7 +207,8 @@ Action StorageShow(Arguments &)
 void AddStorage(Program &program)
 {
     program.Add("storage", "Everything from the bays to the volumes")
-        .Add("", reads, Answer::List(node_columns), R"(Shows what is in each bay and what it is used for, as a tree: disk,
+        .Add("", reads, Answer::List(node_columns),
+             R"(Shows what is in each bay and what it is used for, as a tree: disk,
 partition, array, group, volume. An array is shown once, below its first member that is there. No sleeping disk is
 woken; while one sleeps, groups that are not active are not shown.
 

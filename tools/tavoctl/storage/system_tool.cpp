@@ -19,8 +19,8 @@ std::string ToolResult::Reason() const
     const std::size_t end = output.find_last_not_of(" \t\r\n");
     if (end == output.npos)
         return "it ended with status " + std::to_string(status);
-    const std::size_t start = output.find_last_of("\r\n", end);
-    return output.substr(start == output.npos ? 0 : start + 1, end - (start == output.npos ? 0 : start));
+    const std::size_t start = output.find_last_of("\r\n", end) + 1;  // npos is the largest number
+    return output.substr(start, end + 1 - start);
 }
 
 ToolResult TryTool(const std::vector<std::string> &words)

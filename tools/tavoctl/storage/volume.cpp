@@ -28,9 +28,11 @@ constexpr Column<Volume> volume_columns[] = {
      "of the mounted file system", in_details},
     {"available", [](const Volume &v) { return v.available ? std::optional(Bytes{*v.available}) : std::nullopt; },
      "for users"},
-    {"used", [](const Volume &v) {
+    {"used",
+     [](const Volume &v) {
          return v.capacity && *v.capacity ? std::optional(100 - 100 * *v.available / *v.capacity) : std::nullopt;
-     }, "", in_list, "percent"},
+     },
+     "", in_list, "percent"},
 };
 
 struct CheckedVolume {

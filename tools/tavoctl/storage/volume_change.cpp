@@ -71,10 +71,10 @@ void RefuseMounted(const std::string &place, const std::string &attempted)
 // The numbers that pvs prints, in a row for each device.
 std::vector<std::vector<uint64_t>> NumbersOf(const std::string &group, const std::string &attempted)
 {
-    std::istringstream lines(RunTool({"/sbin/pvs", "--noheadings", "--units", "b", "--nosuffix", "-o",
-                                      "dev_size,pe_start,pv_pe_count,vg_extent_size,vg_free_count", "-S",
-                                      "vg_name=" + group},
-                                     attempted));
+    std::istringstream lines(
+        RunTool({"/sbin/pvs", "--noheadings", "--units", "b", "--nosuffix", "-o",
+                 "dev_size,pe_start,pv_pe_count,vg_extent_size,vg_free_count", "-S", "vg_name=" + group},
+                attempted));
     std::vector<std::vector<uint64_t>> rows;
     for (std::string line; std::getline(lines, line);) {
         std::istringstream words(line);

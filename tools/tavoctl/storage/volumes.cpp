@@ -74,8 +74,8 @@ void AddInactive(std::vector<Volume> &volumes)
         const std::string group = DeviceName(pv.szVg);
         if (group.empty())
             continue;
-        const auto known = std::find_if(volumes.begin(), volumes.end(),
-                                        [&](const Volume &volume) { return volume.group == group; });
+        const auto known =
+            std::find_if(volumes.begin(), volumes.end(), [&](const Volume &volume) { return volume.group == group; });
         if (known == volumes.end())
             volumes.push_back({group, "/dev/" + group + "/lv", {DeviceName(pv.szPv)}, false, {}, {}, {}, {}});
         else if (!known->active)

@@ -10,12 +10,12 @@
 namespace tavoctl {
 
 struct Volume {
-    std::string group;                 // "vg1"
-    std::string device;                // "/dev/vg1/lv"
-    std::vector<std::string> devices;  // under the group: "md2"
-    bool active;                       // the kernel has it
-    std::optional<uint64_t> size;      // bytes, of the device
-    std::string mount;                 // empty: not mounted
+    std::string group;                            // "vg1"
+    std::string device;                           // "/dev/vg1/lv"
+    std::vector<std::string> devices;             // under the group: "md2"
+    bool active;                                  // the kernel has it
+    std::optional<uint64_t> size;                 // bytes, of the device
+    std::string mount;                            // empty: not mounted
     std::optional<uint64_t> capacity, available;  // bytes, of the mounted file system
 
     // Of "vg1": 1; nothing for a group of another name.
@@ -27,7 +27,7 @@ std::vector<Volume> ReadVolumes(bool all);
 
 inline constexpr char volume_help[] = "its number, 1 for /volume1";
 
-std::string VolumePath(int number);    // "/volume1"
+std::string VolumePath(int number);     // "/volume1"
 std::string VolumeGroupOf(int number);  // "/dev/vg1"
 
 // What the first blocks of a device say of an ext2, ext3 or ext4 file system.
