@@ -54,9 +54,9 @@ std::string HashSetting(std::string_view previous, time_t now)
 
 HashMethod ConfiguredHashMethod()
 {
-    if (SettingIs(kFactorySettings, "password_hash", "sha512"))
+    if (SettingEquals(kFactorySettings, "password_hash", "sha512"))
         return HashMethod::kSha512;
-    return SettingIs(kFactorySettings, "password_hash", "yescrypt") ? HashMethod::kYescrypt : HashMethod::kMd5;
+    return SettingEquals(kFactorySettings, "password_hash", "yescrypt") ? HashMethod::kYescrypt : HashMethod::kMd5;
 }
 
 std::string HashPassword(const char *clear, std::string_view previous, time_t now, HashMethod method)

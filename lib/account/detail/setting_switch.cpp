@@ -8,10 +8,10 @@ namespace tavo {
 
 bool SettingIsYes(const char *path, const char *key)
 {
-    return SettingIs(path, key, "yes");
+    return SettingEquals(path, key, "yes");
 }
 
-bool SettingIs(const char *path, const char *key, const char *value)
+bool SettingEquals(const char *path, const char *key, const char *value)
 {
     const KeepFault keep;
     return BlTAVOFileCheckKeyValue(path, key, value) != 0;

@@ -10,8 +10,8 @@ inline constexpr char kFactorySettings[] = "/etc.defaults/tavoinfo.conf";  // wh
 // Whether the key says "yes". Leaves the error state alone.
 bool SettingIsYes(const char *path, const char *key);
 
-// Whether it has that value.
-bool SettingIs(const char *path, const char *key, const char *value);
+// Whether it has exactly that value.
+bool SettingEquals(const char *path, const char *key, const char *value);
 
 }  // namespace tavo
 
