@@ -170,9 +170,7 @@ int Btree::Create(const char *path, std::unique_ptr<Btree> &out)
 Btree::~Btree()
 {
     KeepErrno keep;
-    sealed_ =
-        false;  // where nobody asked for the outcome, something has failed: the stores are made again from the files
-    Close();
+    CloseFile();
 }
 
 int Btree::Get(std::string_view key, std::string_view &value) const
@@ -300,15 +298,20 @@ int Btree::Flush()
 
 int Btree::Close()
 {
+    if (const int code = CloseFile())
+        return code;
+    if (std::exchange(sealed_, false))
+        WriteSeal(*FamilyOfStore(path_.c_str()), texts_);
+    return 0;
+}
+
+int Btree::CloseFile() noexcept
+{
     if (!pDb)
         return 0;
     const NoStoreSync no_sync;
     DB *db = static_cast<DB *>(std::exchange(pDb, nullptr));
-    if (db->close(db) != 0)
-        return ERR_DB_CLOSE;
-    if (sealed_)
-        WriteSeal(*FamilyOfStore(path_.c_str()), texts_);
-    return 0;
+    return db->close(db) == 0 ? 0 : ERR_DB_CLOSE;
 }
 
 // A change through a handle of a caller's own, not by the account families (they break the seal first and make it anew

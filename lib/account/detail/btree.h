@@ -36,7 +36,7 @@ class Btree : public TAVOBDB, public StoreView {
     static Btree *Of(TAVOBDB *handle) { return static_cast<Btree *>(handle); }
     static const Btree *Of(const TAVOBDB *handle) { return static_cast<const Btree *>(handle); }
 
-    ~Btree() override;
+    ~Btree() override;  // without Close: something has failed, and a changed store is not sealed
 
     // The views stay valid until the next call on this handle. Absent: ERR_KEY_NOT_FOUND.
     int Get(std::string_view key, std::string_view &value) const override;
@@ -66,6 +66,8 @@ class Btree : public TAVOBDB, public StoreView {
     }
     bool NoteChange();  // false when nothing may be changed
     int Put(std::string_view key, std::string_view value);
+
+    int CloseFile() noexcept;
 
     std::string path_;
     std::set<std::string, std::less<>> deleted_;
