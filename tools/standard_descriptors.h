@@ -6,15 +6,18 @@
 #include <unistd.h>
 
 // Opens /dev/null in place of each of the descriptors 0 to 2 that is closed: otherwise the first file that the program
-// opens, such as a disk, becomes its standard output, and messages are written into it. First thing in main.
-inline void FillStandardDescriptors() noexcept
+// opens, such as a disk, becomes its standard output, and messages are written into it. First thing in main. Returns
+// whether standard output was one of them: what is written there reaches nobody.
+inline bool FillStandardDescriptors() noexcept
 {
+    bool no_output = false;
     for (;;) {
         const int fd = ::open("/dev/null", O_RDWR | O_NOCTTY);
+        no_output = no_output || fd == STDOUT_FILENO;
         if (fd > 2)
             ::close(fd);
         if (fd < 0 || fd > 2)
-            return;
+            return no_output;
     }
 }
 

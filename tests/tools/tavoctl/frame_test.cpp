@@ -269,8 +269,25 @@ TEST(TavoctlFrame, QuestionsAreAskedAtATerminalOnly)
 
 TEST(TavoctlFrame, AnAnswerThatCannotBeWrittenIsAFailure)
 {
-    const int status = std::system("/usr/bin/tavoctl conf list >/dev/full 2>/dev/null");
-    EXPECT_EQ(test::ShellStatus(status), 1);
+    const ScratchDir dir;
+    const std::string file = dir / "f";
+    const auto status = [&](const std::string &words, const std::string &redirections) {
+        return test::ShellStatus(std::system(("/usr/bin/tavoctl " + words + " " + redirections).c_str()));
+    };
+    WriteFile(file, "k=v\n");
+    EXPECT_EQ(status("conf list --file " + file, ">/dev/full 2>/dev/null"), 1);
+    // Whatever the caller has closed, no message goes into a file, and a change that has nothing to say succeeds.
+    for (int closed = 0; closed < 8; ++closed) {
+        const std::string redirections = std::string(closed & 1 ? " 0<&-" : " 0</dev/null") +
+                                         (closed & 2 ? " 1>&-" : " 1>/dev/null") +
+                                         (closed & 4 ? " 2>&-" : " 2>/dev/null");
+        EXPECT_EQ(status("conf list --file " + file, redirections), closed & 2 ? 1 : 0) << redirections;
+        WriteFile(file, "k=v\n");
+        EXPECT_EQ(status("conf set --file " + file + " k w", redirections), 0) << redirections;
+        EXPECT_EQ(ReadFile(file), "k=w\n") << redirections;
+        EXPECT_NE(status("conf get --file " + file + " absent", redirections), 0) << redirections;
+        EXPECT_EQ(ReadFile(file), "k=w\n") << redirections;
+    }
 }
 
 TEST(TavoctlFrame, TablesShowTheChosenColumnsInTheWidthOfTheTerminal)
