@@ -179,6 +179,11 @@ void *operator new[](size_t size)
     return operator new(size);
 }
 
+void *operator new(size_t size, const std::nothrow_t &) noexcept
+{
+    return malloc(size ? size : 1);
+}
+
 void operator delete(void *block) noexcept
 {
     free(block);
