@@ -1,4 +1,4 @@
-// Tells whether an internal port leads to an expansion unit.
+// Checks whether an internal port leads to an expansion unit.
 #include "tavo_appliance.h"
 
 #include "appliance/detail/expansion_port.h"

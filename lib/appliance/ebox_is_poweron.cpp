@@ -1,4 +1,4 @@
-// Tells whether an expansion unit has power.
+// Checks whether an expansion unit has power.
 #include "tavo_appliance.h"
 
 #include "core/detail/fault.h"

@@ -1,4 +1,4 @@
-// Tells how many internal bays the model has.
+// Returns the number of internal bays of the model.
 #include "tavo_appliance.h"
 
 #include "core/detail/guard.h"

@@ -13,7 +13,7 @@
 
 namespace {
 
-// The operations, numbered as callers of the daemon dispatcher know them.
+// The operations, numbered as in the daemon dispatcher.
 enum { kStop = 1, kStart, kRestart, kReload };
 
 constexpr const char *kPidFile = "/var/run/rsyncd.pid";
@@ -23,7 +23,7 @@ constexpr const char *kOptions = "--config=/usr/tavo/etc/rsyncd.conf";
 constexpr int kStopMilliseconds = 5000;
 constexpr int kLookMilliseconds = 20;
 
-// A server that does not run is stopped. One that runs is waited for: a new one refuses to start beside it.
+// Stopping a stopped server succeeds. A running one is waited for: a new server refuses to start beside it.
 bool Stop()
 {
     if (!tavo::SignalDaemon(kPidFile, SIGTERM))
@@ -59,7 +59,7 @@ extern "C" int TAVONetBkpService(int operation)
         done = Stop() && TLIBExec(kServer, "--daemon", kOptions, nullptr) == 0;
         break;
     case kReload:
-        done = TLIBProcAliveByPidFile(kPidFile);  // it reads its configuration anew for every connection
+        done = TLIBProcAliveByPidFile(kPidFile);  // it reads its configuration again for every connection
         break;
     default:
         return Fail(ERR_BAD_PARAMETERS);

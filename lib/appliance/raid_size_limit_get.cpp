@@ -1,4 +1,4 @@
-// Tells how much of an array member the model uses at most.
+// Returns how much of an array member the model uses at most.
 #include "tavo_appliance.h"
 
 #include "core/detail/guard.h"

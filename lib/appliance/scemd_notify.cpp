@@ -1,4 +1,4 @@
-// Tells the appliance's event daemon that something has changed.
+// Notifies the appliance's event daemon of a change.
 #include "tavo_appliance.h"
 
 #include "appliance/detail/daemon_signal.h"

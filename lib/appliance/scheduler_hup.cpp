@@ -1,4 +1,4 @@
-// Has the download scheduler read the accounts again.
+// Makes the download scheduler read the accounts again.
 #include "tavo_appliance.h"
 
 #include "appliance/detail/daemon_signal.h"

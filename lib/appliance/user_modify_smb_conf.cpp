@@ -30,7 +30,7 @@ extern "C" int TAVOUserModifySmbConf(const TLIBSZHASH *pshNames)
     if (!pshNames)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        if (!tavo::LoadExtras())  // a name that could not be compared would stay as it is
+        if (!tavo::LoadExtras())  // a name that could not be compared would stay unchanged
             return Fail(ERR_OPEN_FAILED);
         tavo::FileRewrite file;
         const int open_code = file.Open(kSmbConf);

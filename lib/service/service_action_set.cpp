@@ -7,7 +7,7 @@
 
 namespace {
 
-// The daemon operation of an action; 0 when the action makes no sense for a daemon without a key.
+// The daemon operation of an action; 0 when the action is meaningless for a daemon without a key.
 int OperationOf(int action)
 {
     switch (action) {

@@ -1,5 +1,5 @@
-// Switches the Apple file service. Its configuration is rewritten by the share functions, so nothing but the standard
-// action belongs here.
+// Switches the Apple file service. The share functions rewrite its configuration, so the standard action is all it
+// needs.
 #include "tavo_service.h"
 
 extern "C" int TAVOServiceAFP(const TAVOSERVICE *pService, int action)

@@ -1,4 +1,4 @@
-// Tells whether the Apple file service is enabled and running.
+// Checks whether the Apple file service is enabled and running.
 #include "tavo_service.h"
 
 extern "C" int TAVOServiceAFPStatus(const TAVOSERVICE *pService)

@@ -1,4 +1,4 @@
-// Switches the audio station. It plays what the index knows, so the indexing daemon follows it.
+// Switches the audio station. It plays the files in the index, so the indexing daemon is restarted after it.
 #include "tavo_service.h"
 
 #include "service/detail/index_follows.h"

@@ -1,4 +1,4 @@
-// Names the daemons that serve a kind of data folder.
+// Returns the daemons that serve a kind of data folder.
 #include "tavo_service.h"
 
 #include "core/detail/fault.h"
@@ -12,7 +12,7 @@ struct FolderDaemons {
     uint32_t mask;
 };
 
-constexpr uint32_t kShown = TAVO_DAEMON_MEDIA | TAVO_DAEMON_INDEX;  // what shows any kind of media
+constexpr uint32_t kShown = TAVO_DAEMON_MEDIA | TAVO_DAEMON_INDEX;  // shows any kind of media
 
 // clang-format off
 constexpr FolderDaemons kFolders[] = {

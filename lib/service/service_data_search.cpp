@@ -1,4 +1,4 @@
-// Looks for a service's data folder on the mounted volumes.
+// Searches the mounted volumes for a service's data folder.
 #include "tavo_service.h"
 
 #include "core/detail/guard.h"

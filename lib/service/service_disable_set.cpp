@@ -1,4 +1,4 @@
-// Sets the enable key of a service to "no"; nothing is stopped.
+// Sets the enable key of a service to "no" without stopping it.
 #include "tavo_service.h"
 
 #include "tavo_file.h"

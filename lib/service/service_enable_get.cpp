@@ -1,4 +1,4 @@
-// Whether the service behind a data folder is enabled.
+// Checks whether the service that owns a data folder is enabled.
 #include "tavo_service.h"
 
 #include "core/detail/fault.h"
@@ -10,10 +10,10 @@ namespace {
 
 constexpr int kDownload = 4;
 
-// The download scheduler keeps settings of its own; its enabled flag there is what counts.
+// The download scheduler has a settings file of its own; the enabled flag there counts.
 constexpr const char *kDownloadSettings = "/usr/tavo/etc/download.conf";
 
-// A key that the file lacks has the value "" and is not a failure.
+// A missing key has the value "" and is not a failure.
 struct DownloadSetting {
     explicit DownloadSetting(const char *key) noexcept
     {

@@ -1,5 +1,5 @@
-// Tells whether the FTP server is enabled and running. The row names a process and the daemon may run under inetd for a
-// single session, so the key alone does not tell and the process is asked for, too.
+// Checks whether the FTP server is enabled and running. The row names a process, but the daemon may run under inetd for
+// a single session. So both the key and the process are checked.
 #include "tavo_service.h"
 
 #include "core/detail/guard.h"

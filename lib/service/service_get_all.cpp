@@ -8,7 +8,7 @@
 
 namespace {
 
-// Several data folders serve one service; the model has it when it has any of them.
+// Several data folders serve one service; the model has the service when it has any of them.
 bool IsSupported(const TAVOSERVICE &service)
 {
     const auto shares = tavo::SharesOf(service);

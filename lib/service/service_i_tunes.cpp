@@ -1,4 +1,4 @@
-// Switches media sharing for players. It offers what the index knows, so the indexing daemon follows it.
+// Switches media sharing for players. It offers the files in the index, so the indexing daemon is restarted after it.
 #include "tavo_service.h"
 
 #include "service/detail/index_follows.h"

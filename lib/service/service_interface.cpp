@@ -1,4 +1,4 @@
-// Looks services up: by id, by name, and one field of a row at a time.
+// Looks up services: by id, by name, and one field of a row at a time.
 #include "tavo_service.h"
 
 #include "core/detail/fault.h"
@@ -10,7 +10,7 @@ namespace {
 
 constexpr int kPrinter = 9;
 
-// One field of a row; the bad id is reported as the look-up's own failure.
+// One field of a row; a bad id is reported as the look-up's own failure.
 template <class Field>
 auto FieldOf(int id, Field TAVOSERVICE::*field, Field none, tavo::Where where = tavo::Where())
 {

@@ -1,4 +1,4 @@
-// Tells whether a service's link leads to a volume.
+// Checks whether a service's link leads to a volume.
 #include "tavo_service.h"
 
 #include "core/detail/fault.h"
@@ -12,6 +12,6 @@ extern "C" int TAVOServiceIsOnVolume(int idShare, const char *szVolume)
         return Fail(ERR_BAD_PARAMETERS);
     if (TAVOServiceSettingGet(idShare, &share) < 0)
         return -1;
-    // The folder itself may be away with its volume; the link says where it belongs.
+    // The folder itself may be missing while its volume is away; the link still names the volume.
     return tavo::VolumeOf(share.szVolume) == szVolume;
 }

@@ -18,7 +18,7 @@ extern "C" int TAVOServiceLinkRemove(int idShare)
         return Fail(ERR_BAD_PARAMETERS);
     if (::lstat(row->share.szLink, &st) != 0)
         return errno == ENOENT || errno == ENOTDIR ? 0 : Fail(ERR_REMOVE_FAILED);
-    // Anything else in the link's place may be somebody's data.
+    // Anything but a link there may be a user's data.
     if (!S_ISLNK(st.st_mode) || ::unlink(row->share.szLink) != 0)
         return Fail(ERR_REMOVE_FAILED);
     return 0;

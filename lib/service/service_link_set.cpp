@@ -21,8 +21,8 @@ bool IsDirectory(const char *path)
     return ::stat(path, &st) == 0 && S_ISDIR(st.st_mode);
 }
 
-// Whatever else stands in the folder's place goes; the caller's umask shapes the mode, so that the folder is not open
-// to everybody where nobody asked for that.
+// Replaces anything but a folder. The caller's umask applies to the mode, so that the folder is not open to everybody
+// unless asked for.
 bool MakeLinkFolder()
 {
     if (IsDirectory(kLinkFolder))
@@ -30,8 +30,7 @@ bool MakeLinkFolder()
     return (::unlink(kLinkFolder) == 0 || errno == ENOENT) && ::mkdir(kLinkFolder, 0777) == 0;
 }
 
-// Only a link is replaced: a folder or a file in its place is somebody's data. The old link stays until the new one is
-// there.
+// Only a link is replaced: a folder or a file there is a user's data. The old link stays until the new one exists.
 bool ReplaceLink(const char *target, const char *path)
 {
     struct stat st;
@@ -41,7 +40,7 @@ bool ReplaceLink(const char *target, const char *path)
         return false;
     char next[PATH_MAX];
     std::snprintf(next, sizeof next, "%s.%d", path, ::getpid());
-    ::unlink(next);  // of a process of that number that died here
+    ::unlink(next);  // left by a process of that number that died here
     if (::symlink(target, next) != 0)
         return false;
     if (::rename(next, path) == 0)

@@ -10,8 +10,9 @@
 
 namespace {
 
-// The settings file, Samba's and the Apple files, exclusively: start scripts write them. So a start script must not call
-// a function that takes one of these locks itself; it would wait for its time-out and fail.
+// The locks of the settings file, of Samba and of the Apple files, exclusively, because start scripts write these
+// files. So a start script must not call a function that takes one of these locks: it would wait for its time-out and
+// fail.
 constexpr unsigned kServiceLock = 0x1846;
 constexpr int kLockSeconds = 5;
 
@@ -20,11 +21,11 @@ constexpr uint32_t kBothWebs = TAVO_DAEMON_WEB_USER | TAVO_DAEMON_WEB_SYSTEM;
 // The highest bit would make the result negative, which callers take for a failure.
 constexpr int kWebSystemDone = 0x40000000;
 
-// What builds on the databases, in the order in which it is stopped.
+// The daemons that use the databases, in the order in which they are stopped.
 constexpr uint32_t kOnDatabase[] = {TAVO_DAEMON_SURVEILLANCE, TAVO_DAEMON_PLAYER,   TAVO_DAEMON_MEDIA,
                                     TAVO_DAEMON_INDEX,        TAVO_DAEMON_DOWNLOAD, TAVO_DAEMON_LOG};
 
-// What the stack drives is not driven a second time for its own bit.
+// The daemons that the stack drives are not driven a second time for their own bits.
 constexpr uint32_t kInsideStack =
     TAVO_DAEMON_MEDIA | TAVO_DAEMON_PLAYER | TAVO_DAEMON_INDEX | TAVO_DAEMON_DOWNLOAD | TAVO_DAEMON_SURVEILLANCE;
 
@@ -35,7 +36,7 @@ constexpr uint32_t kAfterWebs[] = {TAVO_DAEMON_WEBDAV,       TAVO_DAEMON_DOWNLOA
                                    TAVO_DAEMON_SURVEILLANCE, TAVO_DAEMON_NFS,       TAVO_DAEMON_RESTORE,
                                    TAVO_DAEMON_MDNS,         TAVO_DAEMON_LOG,       TAVO_DAEMON_ISCSI};
 
-// Each step runs even when an earlier one failed: a half stopped stack helps nobody.
+// Each step runs even when an earlier one failed: a half stopped stack is useless.
 bool StopOnDatabase()
 {
     bool done = true;
@@ -106,9 +107,9 @@ class Dispatch {
             Note(daemon, tavo::ControlDaemon(daemon, operation_));
     }
 
-    // The two servers share a port range and modules: the user's is away while the system's restarts. Whoever asks for
-    // both wants that, whatever the operation; the management pages themselves come from the system's, so it is stopped
-    // only when it is asked for alone.
+    // The two servers share a port range and modules, so the user's is stopped while the system's restarts. A caller
+    // that asks for both gets this for every operation. The management pages themselves come from the system's server,
+    // so it is stopped only when it is asked for alone.
     void BothWebs()
     {
         const bool stopped = tavo::ControlDaemon(TAVO_DAEMON_WEB_USER, TAVO_DAEMON_STOP);
@@ -139,7 +140,7 @@ extern "C" int TAVONetService(uint32_t fDaemon, int operation)
     const tavo::LockHold lock(kServiceLock, kLockSeconds);
     if (!lock) {
         LogError("%s(%d): lock failed");
-        return -1;  // the lock's own code stands
+        return -1;  // the lock's own code is kept
     }
     return Guard([&] { return Dispatch(fDaemon, operation).Run(); });
 }

@@ -1,4 +1,4 @@
-// Chooses the volume on which a service is to keep its data.
+// Chooses the volume for a service's data.
 #include "tavo_service.h"
 
 #include "core/detail/guard.h"
@@ -21,8 +21,8 @@ unsigned long long FreeBytes(const tavo::Volume &volume)
     return static_cast<unsigned long long>(space.f_bavail) * space.f_frsize;
 }
 
-// The mounted volume that holds the service's data; 0 when its folder is gone, -1 when its link cannot be read. A folder
-// that is found where the volume is not mounted is on the system's own disk.
+// Returns the mounted volume that holds the service's data; 0 when its folder is gone, -1 when its link cannot be read.
+// A folder at the path of an unmounted volume is on the system's own disk and does not count.
 int OldVolume(int idShare, const std::vector<tavo::Volume> &mounted)
 {
     TAVOSERVICESHARE share;
@@ -60,7 +60,7 @@ extern "C" int TAVOServiceNewVolumeDecide(int idShare, char *szVolume, int cbVol
         const std::vector<tavo::Volume> mounted = tavo::MountedVolumes();
         int number = OldVolume(idShare, mounted);
         if (number < 0)
-            return -1;  // another volume would be chosen although the data is there
+            return -1;  // another volume would be chosen although the data exists
         if (number == 0)
             number = RoomiestVolume(mounted);
         if (number == 0)

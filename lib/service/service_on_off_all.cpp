@@ -1,4 +1,4 @@
-// Stops or starts every enabled service; the keys stay as they are.
+// Stops or starts every enabled service without changing keys.
 #include "tavo_service.h"
 
 #include "core/detail/log.h"

@@ -1,5 +1,5 @@
-// Tells whether the printer spooler has its folder and runs. The row has no key and no pid file: the spooler starts with
-// the first printer.
+// Checks whether the printer spooler has its folder and runs. The row has no key and no pid file: the spooler starts
+// with the first printer.
 #include "tavo_service.h"
 
 #include "core/detail/guard.h"

@@ -1,4 +1,4 @@
-// Releases the data folders of a service, but those that another enabled service uses.
+// Releases the data folders of a service that no other enabled service uses.
 #include "tavo_service.h"
 
 #include "core/detail/fault.h"

@@ -1,4 +1,4 @@
-// Releases the data folders that lie on a volume, before it is taken out of use.
+// Releases the data folders on a volume, before it is taken out of use.
 #include "tavo_service.h"
 
 #include "core/detail/fault.h"

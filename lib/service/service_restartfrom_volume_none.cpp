@@ -1,4 +1,4 @@
-// Brings back the enabled services that had no volume, after the first one appeared.
+// Restarts the enabled services that had no volume, after the first one appeared.
 #include "tavo_service.h"
 
 #include "core/detail/log.h"

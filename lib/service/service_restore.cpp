@@ -12,7 +12,7 @@
 
 namespace {
 
-// Links again what stands on the volume; a folder that leads elsewhere by now stays there.
+// Links the folders on the volume again; a link that leads to another volume by now is kept.
 int BindAgain(const TAVOSERVICE &service, const char *volume)
 {
     int bound = 0;

@@ -1,5 +1,5 @@
-// Switches Windows file sharing. Its configuration is rewritten by the share and account functions, so nothing but the
-// standard action belongs here.
+// Switches Windows file sharing. The share and account functions rewrite its configuration, so the standard action is
+// all it needs.
 #include "tavo_service.h"
 
 extern "C" int TAVOServiceSAMBA(const TAVOSERVICE *pService, int action)

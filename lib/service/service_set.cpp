@@ -14,7 +14,7 @@ extern "C" int TAVOServiceSet(int idShare, const char *szVolume)
     if (TAVOServiceShareGen(idShare, szVolume, path, sizeof path) < 0)
         return -1;  // with its code
     return Guard([&] {
-        // Callers bind services before the volume is mounted, so this is not refused; but data that is written until
+        // Callers bind services before the volume is mounted, so this is not refused. But data that is written until
         // then fills the system's own disk and disappears under the mount.
         if (tavo::VolumeType(szVolume) < 0)
             LogError("%s:%d %s is not mounted: %s is on the system disk", szVolume, path);

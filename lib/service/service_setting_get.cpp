@@ -1,4 +1,4 @@
-// Fills the record of a service's data folder: its name, its capability, and where its link leads.
+// Fills the record of a service's data folder: its name, its capability, and the target of its link.
 #include "tavo_service.h"
 
 #include "core/detail/guard.h"

@@ -11,7 +11,7 @@
 
 namespace {
 
-// Makes what is missing of `path` below its volume.
+// Creates the missing folders of `path` below its volume.
 bool MakeFolders(const std::string &path)
 {
     for (size_t slash = path.find('/', 1); slash != std::string::npos;) {

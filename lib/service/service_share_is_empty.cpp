@@ -1,4 +1,4 @@
-// Whether the data folder of a service holds anything.
+// Checks whether the data folder of a service is empty.
 #include "tavo_service.h"
 
 #include "core/detail/fault.h"
@@ -13,6 +13,6 @@ extern "C" int TAVOServiceShareIsEmpty(int idShare)
     tavo::FolderReader folder(row->share.szLink);
     if (folder.Next())
         return 0;
-    // Callers delete what is empty, so a folder that cannot be read must not pass for one.
+    // Callers delete empty folders, so an unreadable one must not look empty.
     return folder.Failed() ? Fail(ERR_MAKE_PATH) : 1;
 }

@@ -1,4 +1,4 @@
-// Forgets the share of a service and deletes its folder when the caller says so.
+// Removes the record of a service's share and, on request, deletes its folder.
 #include "tavo_service.h"
 
 #include "core/detail/guard.h"
@@ -12,7 +12,7 @@
 
 namespace {
 
-// Who may write to the volume must not choose what root deletes.
+// A user who may write to the volume must not choose what root deletes.
 bool IsBehindNoLink(const std::string &path)
 {
     for (size_t slash = path.find('/', 1); slash != std::string::npos; slash = path.find('/', slash + 1)) {
@@ -35,7 +35,7 @@ extern "C" int TAVOServiceShareRemove(int idShare, int fDelete)
         std::string path;
         if (const int code = tavo::SharePath(share.szShareName, path))
             return Fail(code);
-        // A record that points outside the volumes was not made here, and nothing is deleted for it.
+        // The library never records a path outside the volumes, so it deletes nothing for such a record.
         if (fDelete && !tavo::VolumeOf(path).empty() && path.find("/../") == std::string::npos &&
             path.ends_with(share.szShareName) && IsBehindNoLink(path)) {
             std::error_code failed;

@@ -1,4 +1,4 @@
-// Records another volume for the share of a service; what lies on the volumes stays where it is.
+// Records another volume for the share of a service; the data is not moved.
 #include "tavo_service.h"
 
 #include "core/detail/guard.h"

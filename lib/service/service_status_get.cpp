@@ -1,4 +1,4 @@
-// Tells whether a service is enabled and running.
+// Checks whether a service is enabled and running.
 #include "tavo_service.h"
 
 #include "core/detail/fault.h"

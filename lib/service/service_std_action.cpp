@@ -43,7 +43,7 @@ bool BindShares(const TAVOSERVICE &service)
     return true;
 }
 
-// A service with daemons is the dispatcher's: its script is run there, or not at all.
+// The dispatcher drives a service with daemons: its script is run there, or not at all.
 int RunService(const TAVOSERVICE &service, const Plan &plan)
 {
     if (service.fDaemon) {

@@ -1,4 +1,4 @@
-// Tells whether a service is enabled, has its data folders and runs: the standard handler.
+// Checks whether a service is enabled, has its data folders and runs: the standard handler.
 #include "tavo_service.h"
 
 #include "tavo_file.h"
@@ -27,7 +27,7 @@ bool IsNo(const char *key)
     return BlTAVOFileCheckKeyValue(tavo::kSettings, key, "no");
 }
 
-// Only a "no" switches a service off: one whose key was never written runs.
+// Only "no" switches a service off: a service whose key was never written is on.
 Enabled IsEnabled(const char *key)
 {
     if (!key)
@@ -46,7 +46,7 @@ bool IsRunning(const char *proc)
         return true;
     if (!std::strchr(proc, '/'))
         return tavo::IsProcessNamed(proc);
-    // A daemon that has ended takes signals until its parent has asked for its status.
+    // A zombie still accepts signals until its parent asks for its status.
     return TLIBProcAliveByPidFile(proc) && !tavo::IsZombie(TLIBReadPidFile(proc));
 }
 

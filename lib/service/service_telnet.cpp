@@ -1,5 +1,4 @@
-// Switches Telnet. inetd serves other protocols as well: it is never stopped for Telnet's sake, but restarted, so that it
-// reads the key anew.
+// Switches Telnet. inetd serves other protocols as well, so it is restarted, never stopped: it reads the key again.
 #include "tavo_service.h"
 
 #include "tavo_file.h"
@@ -10,7 +9,7 @@
 
 namespace {
 
-// The key that an action leaves; NULL: it stays.
+// The key after an action; NULL: unchanged.
 const char *KeyAfter(int action)
 {
     switch (action) {

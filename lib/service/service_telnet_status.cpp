@@ -1,4 +1,4 @@
-// Tells whether Telnet is enabled and inetd, which answers for it, runs.
+// Checks whether Telnet is enabled and inetd, which answers for it, runs.
 #include "tavo_service.h"
 
 #include "core/detail/guard.h"

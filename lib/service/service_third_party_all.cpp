@@ -19,7 +19,7 @@ namespace {
 
 constexpr const char *kPackages = "/usr/tavo/etc/rc.d/packages";
 
-// Whether the folder was read to its end; an appliance without packages has none.
+// False when the folder could not be read to its end. An appliance without packages has no folder.
 bool FindScripts(std::vector<std::string> &scripts)
 {
     tavo::FolderReader folder(kPackages);

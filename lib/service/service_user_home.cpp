@@ -19,7 +19,7 @@ namespace {
 
 constexpr const char *kHomes = "/var/services/homes";
 
-// A home is made for the user alone; one that exists, or whatever else has its name, stays as it is.
+// Creates a home that only its user may enter. An existing file or folder of that name is not changed.
 void MakeHome(int homes, const char *user)
 {
     const passwd *account = ::getpwnam(user);

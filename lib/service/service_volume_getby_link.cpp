@@ -19,7 +19,7 @@ std::string_view Parent(std::string_view path)
     return slash == std::string_view::npos ? "" : path.substr(0, slash == 0 ? 1 : slash);
 }
 
-// The directory that holds the target; the database folders stand one level deeper.
+// The directory that holds the target; the database folders are one level deeper.
 std::string_view VolumePath(std::string_view target)
 {
     const std::string_view holder = Parent(target);

@@ -1,4 +1,4 @@
-// Tells on which volume a share lies.
+// Returns the volume that holds a share.
 #include "tavo_service.h"
 
 #include "core/detail/guard.h"

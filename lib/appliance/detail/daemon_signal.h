@@ -4,7 +4,7 @@
 
 namespace tavo {
 
-// True when it was sent, and when there is nobody to send it to. Leaves the error state alone.
+// True when the signal was sent, and when no such daemon runs. Leaves the error state alone.
 bool SignalDaemon(const char *pid_file, int signal);
 
 }  // namespace tavo

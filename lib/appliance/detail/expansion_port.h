@@ -1,4 +1,4 @@
-// Expansion units as the kernel shows them: a port multiplier where an internal port has a disk otherwise.
+// Expansion units as the kernel shows them: a port multiplier on an internal port, in place of a disk.
 #ifndef TAVO_APPLIANCE_DETAIL_EXPANSION_PORT_H
 #define TAVO_APPLIANCE_DETAIL_EXPANSION_PORT_H
 
@@ -14,7 +14,7 @@ bool CanSeePorts();
 // Ports count from 0 here and from 1 in the kernel.
 bool HasPortMultiplier(int port);
 
-// Whether the link to the unit has a speed. A unit that is switched off stays known until the next start.
+// Whether the link to the unit has a speed. A unit that is switched off stays listed until the next start.
 bool HasLink(int port);
 
 // Fills in the disks of a unit: "/dev/sd", the unit's letter and the disk's.

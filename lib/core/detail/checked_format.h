@@ -1,4 +1,5 @@
-// A printf-like format that the compiler compares with its arguments: a call whose arguments do not fit does not compile.
+// A printf-like format that the compiler compares with its arguments: a call whose arguments do not fit does not
+// compile.
 #ifndef TAVO_CORE_DETAIL_CHECKED_FORMAT_H
 #define TAVO_CORE_DETAIL_CHECKED_FORMAT_H
 
@@ -19,7 +20,8 @@ void FormatHasFewerConversionsThanArguments();
 void FormatHasAnUnknownConversion();
 void TextConversionNeedsTextAndNumberConversionNeedsANumber();
 
-// %s takes text, %c either, %d, %i, %u, %x and %X numbers, with a zero flag, a width and length modifiers; %% takes nothing.
+// %s takes text, %c too; %d, %i, %u, %x and %X take numbers, with a zero flag, a width and length modifiers; %% takes
+// nothing.
 consteval void CheckFormat(std::string_view format, const ArgKind *kinds, size_t count)
 {
     size_t used = 0;
@@ -60,7 +62,7 @@ class CheckedFormat {
     const char *text_;
 };
 
-// As a parameter: the format for these arguments.
+// The parameter type of a format for these arguments.
 template <class... Args>
 using FormatFor = CheckedFormat<kArgKind<Args>...>;
 

@@ -15,8 +15,8 @@
 namespace tavo {
 namespace {
 
-// One pipe a process. Programs that become daemons close all descriptors and may get these numbers for other files, so
-// the pipe is recognised before it is used, and the handler is silent while nobody waits.
+// One pipe per process. Programs that become daemons close all descriptors and may reuse these numbers for other files,
+// so the pipe is checked before each use. The handler does nothing while no bell exists.
 struct BellPipe {
     int ends[2];
     dev_t device;
@@ -43,7 +43,7 @@ void OpenPipe()
     if (IsStillOpen()) {
         if (bell.owner == ::getpid())
             return;
-        // Inherited by fork: the parent's rings would be taken from it here.
+        // After a fork the pipe is shared, and this process would take the parent's rings from it.
         ::close(bell.ends[0]);
         ::close(bell.ends[1]);
     }

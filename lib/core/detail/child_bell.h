@@ -1,7 +1,7 @@
-// Rings when a child of this process ends, so that one can wait for a child and for a deadline at once.
+// Rings when a child of this process ends, so that a caller can wait for a child and for a deadline at once.
 //
-// While a bell exists, children keep their status until they are collected. The SIGCHLD handler that rings it stays
-// installed when the bell goes; a process that had its children collected by the kernel has them so again.
+// While a bell exists, children keep their status until they are collected. The SIGCHLD handler stays installed after
+// the bell is gone. In a process whose children the kernel collected, the kernel collects them again then.
 #ifndef TAVO_CORE_DETAIL_CHILD_BELL_H
 #define TAVO_CORE_DETAIL_CHILD_BELL_H
 
@@ -14,7 +14,7 @@ class ChildBell {
   public:
     using Clock = std::chrono::steady_clock;
 
-    ChildBell() noexcept;  // aborts the process when it has no descriptors left
+    ChildBell() noexcept;  // aborts the process when it has no free descriptor
     ~ChildBell();
     ChildBell(const ChildBell &) = delete;
     ChildBell &operator=(const ChildBell &) = delete;

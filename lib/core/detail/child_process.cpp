@@ -18,7 +18,7 @@
 namespace tavo {
 namespace {
 
-// From here to RunChild everything happens in the child and in the parent's memory: system calls, and nothing else.
+// From here to RunChild the code runs in the child but in the parent's memory: it makes system calls and nothing else.
 
 [[noreturn]] void GiveUp(const ChildPlan &plan)
 {
@@ -66,7 +66,8 @@ void CloseOtherDescriptors()
     if (::syscall(SYS_close_range, 3u, UINT_MAX, 0u) == 0)
         return;
 #endif
-    // Kernels and emulators without close_range; beyond this, limits are higher than anybody's descriptors.
+    // For kernels and emulators without close_range. No process uses descriptors beyond this number, even where its
+    // limit is higher.
     constexpr rlim_t highest = 65536;
     struct rlimit limit = {highest, highest};
     ::getrlimit(RLIMIT_NOFILE, &limit);
@@ -75,7 +76,7 @@ void CloseOtherDescriptors()
         ::close(fd);
 }
 
-// Takes the parent's handlers away before a signal can reach the child and run one of them in the parent's memory.
+// Resets the parent's handlers before a signal can reach the child and run one of them in the parent's memory.
 void SetSignals(const ChildPlan &plan, const sigset_t &parent_mask)
 {
     struct sigaction by_default = {};
@@ -92,7 +93,7 @@ void SetSignals(const ChildPlan &plan, const sigset_t &parent_mask)
     ::sigprocmask(SIG_SETMASK, &mask, nullptr);
 }
 
-// While a copy waits for its program it must not hold on to locks that its parent loses.
+// A copy that waits for its program must not keep locks that its parent loses.
 void CloseLocks()
 {
     for (const TLIBLOCKFILE *entry = rgslckList; entry->fLockBit != 0; ++entry) {

@@ -40,7 +40,7 @@ void ReapLeftChildren() noexcept
 {
     KeepErrno keep;
     for (pid_t &child : left_children) {
-        // In a forked child it is not its child: ECHILD.
+        // In a forked child the pid is not its child: ECHILD.
         if (child > 0 && ::waitpid(child, nullptr, WNOHANG) != 0)
             child = 0;
     }

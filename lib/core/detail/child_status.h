@@ -1,4 +1,4 @@
-// What became of child processes, whatever the process has set for SIGCHLD.
+// Collects the status of child processes, whatever the process has set for SIGCHLD.
 #ifndef TAVO_CORE_DETAIL_CHILD_STATUS_H
 #define TAVO_CORE_DETAIL_CHILD_STATUS_H
 
@@ -8,14 +8,14 @@
 
 namespace tavo {
 
-// The result of a wait status: the exit code, -1 for a death by signal.
+// Converts a wait status: the exit code, -1 for a death by signal.
 int ExitResult(int wait_status) noexcept;
 
-// Waits for the child: its result, 0 when somebody else has collected it, -1 when waiting failed.
+// Waits for the child. Returns its result, 0 when another part of the process has collected it, -1 when waiting failed.
 int CollectChild(pid_t pid) noexcept;
 
-// For as long as it lives, children keep their status until they are collected, whatever the process has set for
-// SIGCHLD. A process that ignores SIGCHLD finds no zombie of its other children afterwards.
+// While this object exists, children keep their status until they are collected, whatever the process has set for
+// SIGCHLD. A process that ignores SIGCHLD finds no zombies of its other children afterwards.
 class KeepChildStatus {
   public:
     KeepChildStatus() noexcept;
@@ -28,12 +28,12 @@ class KeepChildStatus {
     bool changed_;
 };
 
-// Remembers a child that has been killed and does not die, because it waits in the kernel for a disk. A later call that
-// starts a program collects it, so that it stays no zombie for ever. Of many such children the latest are remembered.
+// Remembers a killed child that does not die because it waits in the kernel for a disk. A later call that starts a
+// program collects it, so that it does not remain a zombie. Only the latest such children are remembered.
 void LeaveChild(pid_t pid) noexcept;
 void ReapLeftChildren() noexcept;
 
-// Collects what has ended of the children that a process which ignores SIGCHLD does not want to hear of.
+// Collects ended children of a process that ignores SIGCHLD.
 void SweepZombies() noexcept;
 
 }  // namespace tavo

@@ -1,4 +1,4 @@
-// Runs a composed command line through the shell and hands out its standard output line by line.
+// Runs a composed command line through the shell and returns its standard output line by line.
 #include "core/detail/command_output.h"
 
 #include "core/detail/open_file.h"

@@ -1,4 +1,4 @@
-// Runs a composed command line through the shell and hands out its standard output line by line.
+// Runs a composed command line through the shell and returns its standard output line by line.
 //
 //     CommandOutput output(*command);
 //     for (std::string line; output.Next(line);)
@@ -18,20 +18,20 @@ namespace tavo {
 
 class CommandOutput {
   public:
-    // Starts the command, in the surroundings that run_command.h describes; what it says on its standard error is logged
-    // when this object goes. Throws bad_alloc.
+    // Starts the command in the environment that run_command.h describes. The destructor logs the command's standard
+    // error. Throws bad_alloc.
     explicit CommandOutput(const std::string &command);
 
-    // Waits for the command's end; one that still writes to its output is ended by SIGPIPE.
+    // Waits for the command's end; a command that still writes to its output dies by SIGPIPE.
     ~CommandOutput();
     CommandOutput(const CommandOutput &) = delete;
     CommandOutput &operator=(const CommandOutput &) = delete;
 
-    // The next line without its newline; false at the end. A last line without newline counts. Throws bad_alloc.
+    // Reads the next line without its newline; false at the end. A last line without newline counts. Throws bad_alloc.
     bool Next(std::string &line);
 
-    // Skips what has not been read and waits for the end: the exit status, or -1 when the command could not be run or
-    // was killed by a signal.
+    // Skips unread output and waits for the end: the exit status, or -1 when the command could not be run or was killed
+    // by a signal.
     int Status() noexcept;
 
   private:

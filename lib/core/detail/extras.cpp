@@ -1,4 +1,4 @@
-// Loads the small library with what few callers need.
+// Loads the small library that few callers need.
 #include "core/detail/extras.h"
 
 #include "core/detail/log.h"
@@ -20,8 +20,8 @@ constexpr std::string_view kExtrasFolder = "/tavosdk/";
 constinit std::atomic<const Extras *> loaded_extras = nullptr;
 constinit std::atomic<bool> told_of_extras = false;
 
-// The small library in the folder beside the object that holds this code. A program and a library with a relative name
-// know their folder by "$ORIGIN" alone: the working directory may be another one by now.
+// The path of the small library, in the folder of the object that holds this code. "$ORIGIN" is needed for programs and
+// libraries with a relative name: the working directory may have changed since the start.
 bool FileBeside(char (&path)[PATH_MAX]) noexcept
 {
     Dl_info info;
@@ -43,7 +43,7 @@ void *OpenExtras() noexcept
     constexpr int mode = RTLD_NOW | RTLD_LOCAL;
     char beside[PATH_MAX];
     void *handle = FileBeside(beside) ? ::dlopen(beside, mode) : nullptr;
-    // A program that holds the library itself says in its run path where an installation has it.
+    // A program that contains the library finds an installed small library through its run path.
     return handle ? handle : ::dlopen(kExtrasFile, mode);
 }
 

@@ -1,4 +1,4 @@
-// How an exported function reports a failure: code, module and line in one call that returns the failure value.
+// How an exported function reports a failure: one call records code, module and line and returns the failure value.
 #ifndef TAVO_CORE_DETAIL_FAULT_H
 #define TAVO_CORE_DETAIL_FAULT_H
 

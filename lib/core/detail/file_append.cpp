@@ -7,7 +7,7 @@
 namespace tavo {
 namespace {
 
-// Only what is ours: should another process have appended behind it, its text is worth more than a tidy end.
+// Removes only our own text: text that another process has appended since is worth more than a tidy end.
 void CutBack(int fd, off_t old_size, size_t appended)
 {
     KeepErrno keep;

@@ -8,11 +8,11 @@
 
 namespace tavo {
 
-// Opens a regular file for reading and appending, through the gate of trusted_file.h; empty with errno on failure.
+// Opens a regular file for reading and appending, with the checks of trusted_file.h; empty with errno on failure.
 Fd OpenToAppend(const char *path);
 
-// Appends text in one write and syncs it; `fd` is open for reading and appending. A last line that lacks its newline,
-// as a crash may leave it, gets it first. When it fails, the file is cut back to its old length.
+// Appends text in one write and syncs it; `fd` is open for reading and appending. If a crash has left a last line
+// without its newline, the newline is added first. On failure the file is cut back to its old length.
 bool AppendText(int fd, std::string text);
 
 }  // namespace tavo

@@ -1,4 +1,4 @@
-// Replaces a file as a whole.
+// Replaces a whole file.
 #include "core/detail/file_rewrite.h"
 
 #include "core/detail/file_target.h"
@@ -13,8 +13,8 @@
 namespace tavo {
 namespace {
 
-// Access lists, security labels and whatever else hangs on the old file. What cannot be copied is left out: not every
-// file system takes them, and the setting is worth more than its label.
+// Copies access lists, security labels and other extended attributes of the old file. Attributes that cannot be copied
+// are left out: not every file system supports them, and the setting matters more than its label.
 void CopyAttributes(int from, int to) noexcept
 {
     char names[1024];

@@ -1,5 +1,5 @@
-// The one way in which a settings or account file is replaced: a temporary file beside it, synced, with the old owner,
-// mode and extended attributes, renamed over it. Whatever happens, the file is the old or the new one.
+// The only way in which the library replaces a settings or account file: a temporary file beside it, synced, with the
+// old owner, mode and extended attributes, renamed over it. After any failure the file is the old or the new one.
 #ifndef TAVO_CORE_DETAIL_FILE_REWRITE_H
 #define TAVO_CORE_DETAIL_FILE_REWRITE_H
 
@@ -11,33 +11,33 @@
 
 namespace tavo {
 
-// Codes are those that the caller reports; 0 is success.
+// Returns codes for the caller to report; 0 is success.
 class FileRewrite {
   public:
-    // Opens the file that is to be replaced: ERR_OPEN_FAILED (also when it is no regular file) or ERR_STAT_FAILED. A
-    // file that does not exist is ERR_OPEN_FAILED with IsMissing(); Replace then creates it. A symbolic link is
-    // followed, except in a directory that everybody may write to.
+    // Opens the file to be replaced: ERR_OPEN_FAILED (also when it is not a regular file) or ERR_STAT_FAILED. A missing
+    // file is ERR_OPEN_FAILED with IsMissing(); Replace then creates it. A symbolic link is followed, except in a
+    // directory that everybody may write to.
     int Open(const char *path);
     bool IsMissing() const noexcept { return missing_; }
 
-    // The old text; false after a read error.
+    // Reads the old text; false after a read error.
     bool Read(std::string &text);
 
-    // ERR_OPEN_FAILED: no temporary file; ERR_WRITE_FAILED: it could not be completed (errno says why);
-    // ERR_RENAME_FAILED. An existing file's owner and mode are kept, a new one gets `mode_of_new`, whatever the umask.
+    // ERR_OPEN_FAILED: no temporary file; ERR_WRITE_FAILED: it could not be completed (errno has the reason);
+    // ERR_RENAME_FAILED. An existing file keeps its owner and mode. A new one gets `mode_of_new`, whatever the umask.
     int Replace(std::string_view text, mode_t mode_of_new = 0644);
 
-    // The same through a temporary file elsewhere; when it lies on another file system, ERR_RENAME_FAILED with EXDEV.
+    // The same through a temporary file elsewhere; ERR_RENAME_FAILED with EXDEV when it is on another file system.
     int ReplaceBy(TempFile &temp, std::string_view text, mode_t mode_of_new = 0644);
 
-    // The first half of that, for callers who move several files together: the text, owner, mode and attributes go into
-    // `temp`, which is synced and closed. False with errno.
+    // The first half of that, for callers that rename several files together: writes text, owner, mode and attributes
+    // to `temp`, syncs and closes it. False with errno.
     bool Complete(Fd &temp, std::string_view text, mode_t mode_of_new = 0666) noexcept;
 
-    // Whether the last Replace also made its rename durable. It has taken place all the same.
+    // Whether the last Replace also made its rename durable. The rename has happened either way.
     bool IsDirectorySynced() const noexcept { return directory_synced_; }
 
-    // The file itself, behind any link.
+    // The path of the file itself, with links followed.
     const std::string &Target() const noexcept { return target_; }
 
   private:

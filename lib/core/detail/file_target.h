@@ -1,4 +1,4 @@
-// Where a path leads: the file that a rewrite replaces, so that a link to it stays a link.
+// Finds the file that a path leads to, so that a rewrite replaces that file and keeps the link.
 #ifndef TAVO_CORE_DETAIL_FILE_TARGET_H
 #define TAVO_CORE_DETAIL_FILE_TARGET_H
 
@@ -6,12 +6,12 @@
 
 namespace tavo {
 
-// The absolute path without links of a file that exists or can be created; a link whose target is missing leads to that
-// target. Empty when its directory does not exist, when the path names no file, and, as a trap, for a link in a
-// directory that everybody may write to.
+// Returns the absolute path, without links, of a file that exists or can be created. A link whose target is missing
+// leads to that target. Empty when the directory does not exist or the path does not name a file. Also empty for a link
+// in a directory that everybody may write to, which may be a trap.
 std::string FileTarget(const std::string &path);
 
-// The directory part of an absolute path.
+// Returns the directory part of an absolute path.
 std::string DirectoryOf(const std::string &path);
 
 }  // namespace tavo

@@ -21,10 +21,10 @@ constexpr int32_t FoldAscii(char byte)
     return byte >= 'A' && byte <= 'Z' ? byte + ('a' - 'A') : byte;
 }
 
-// ICU's macro needs nothing of its library, and narrows where it has masked.
+// ICU's macro needs nothing from its library; its narrowing conversions are masked first.
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Wconversion"
-// The code point at `at`, which moves behind it; negative when the bytes are not UTF-8.
+// Reads the code point at `at` and advances; negative when the bytes are not UTF-8.
 int32_t NextCodePoint(const char *&at)
 {
     int32_t code_point;
@@ -63,7 +63,7 @@ class FoldedCursor {
     }
 
   private:
-    // Few characters fold to more than one; those wait in the buffer.
+    // Few characters fold to more than one; the others wait in the buffer.
     int32_t Fold(int32_t code_point)
     {
         const Extras *extras = LoadExtras();

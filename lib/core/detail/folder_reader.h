@@ -1,5 +1,5 @@
-// Reads the names in a folder. A folder that cannot be read to its end is a failure of its own: on a dying disk it must
-// not pass for an empty one.
+// Reads the names in a folder. A folder that cannot be read to its end is reported as a failure: on a dying disk it
+// must not look empty.
 //
 //     FolderReader folder(path);
 //     while (const char *name = folder.Next())
@@ -16,19 +16,20 @@ namespace tavo {
 
 class FolderReader {
   public:
-    // A link to a folder is followed. A folder that cannot be opened has no names and has Failed.
+    // Follows a link to a folder. A folder that cannot be opened has no names and has Failed.
     explicit FolderReader(const char *path) noexcept;
 
-    // Takes an open folder over, which must not be at a place that matters to others who share its descriptor.
+    // Takes ownership of an open folder. Reading moves the descriptor's position, which others may share.
     explicit FolderReader(Fd folder) noexcept;
     ~FolderReader();
     FolderReader(const FolderReader &) = delete;
     FolderReader &operator=(const FolderReader &) = delete;
 
-    // The next name but "." and "..", in no order; valid until the next call. NULL at the end and after a read error.
+    // Returns the next name except "." and "..", in no order; valid until the next call. NULL at the end and after a
+    // read error.
     const char *Next() noexcept;
 
-    // After the last name: whether something was left unread, errno then says why.
+    // To be asked after the last name: whether some names could not be read; errno has the reason.
     bool Failed() const noexcept;
 
     // For the *at functions; -1 when the folder cannot be opened.

@@ -1,4 +1,4 @@
-// A reference to something callable, for parameters that are called before the function returns. It owns nothing.
+// A reference to a callable, for parameters that are called before the function returns. It owns nothing.
 #ifndef TAVO_CORE_DETAIL_FUNCTION_REF_H
 #define TAVO_CORE_DETAIL_FUNCTION_REF_H
 

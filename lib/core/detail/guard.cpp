@@ -1,4 +1,4 @@
-// What an exception becomes at the boundary.
+// Turns exceptions into codes at the boundary.
 #include "core/detail/guard.h"
 
 #include "core/detail/log.h"

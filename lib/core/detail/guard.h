@@ -1,4 +1,4 @@
-// Keeps exceptions inside: the boundary is C, where running out of memory is an answer and not a crash.
+// Keeps exceptions inside the library: its callers are C, where running out of memory is a result and not a crash.
 #ifndef TAVO_CORE_DETAIL_GUARD_H
 #define TAVO_CORE_DETAIL_GUARD_H
 
@@ -8,8 +8,8 @@
 
 namespace tavo {
 
-// While one of these lives, the cancellation of this thread waits: it unwinds the stack by an exception that must not be
-// caught, and would end the whole program at the boundary.
+// While this object exists, cancellation of the thread is deferred. Cancellation unwinds the stack by an exception that
+// must not be caught, and that would end the whole program at the boundary.
 class CancellationOff {
   public:
     CancellationOff() noexcept;
@@ -21,8 +21,8 @@ class CancellationOff {
     int before_;
 };
 
-// Called in a handler: the code that the exception in flight becomes. That is `out_of_memory` for an allocation that
-// failed or a text larger than the address space; everything else is ERR_UNKNOWN and logged.
+// To be called in a handler. Returns `out_of_memory` for a failed allocation or a text larger than the address space.
+// Everything else is logged and becomes ERR_UNKNOWN.
 int CodeOfException(int out_of_memory, const Where &where) noexcept;
 
 // Runs the body of an exported function. An exception is recorded as its code, and the failure value of the body's

@@ -1,4 +1,4 @@
-// Looking a key up in a string hash's table.
+// Looks up a key in a string hash's table.
 #include "core/detail/hash_table.h"
 
 #include "core/detail/hash_slot.h"
@@ -11,7 +11,7 @@ const char *StringEnd(const TLIBSZHASH *hash)
     return reinterpret_cast<const char *>(hash->slots + hash->nSlot) + hash->nStrSize;
 }
 
-// Whether two stretches of `bytes` readable bytes are the same. Keys are short: a call of memcmp costs more than they do.
+// Compares `bytes` readable bytes. Keys are short: calling memcmp would cost more than the comparison.
 bool SameBytes(const char *a, const char *b, size_t bytes)
 {
     if (bytes < 8) {
@@ -26,7 +26,7 @@ bool SameBytes(const char *a, const char *b, size_t bytes)
     return Load<uint64_t>(a + bytes - 8) == Load<uint64_t>(b + bytes - 8);
 }
 
-// A key is compared with its NUL. What stands behind a shorter one is in the block too, except at its very end.
+// A key is compared including its NUL. The bytes after a shorter key are in the block too, except at its very end.
 bool Holds(const TLIBSZHASHSLOT &slot, std::string_view key, const char *end)
 {
     const size_t bytes = key.size() + 1;

@@ -1,4 +1,4 @@
-// Where a key's search begins and how it goes on: looking up and storing both compile it in.
+// Where the search for a key begins and how it continues; inlined into both look-up and storing.
 #ifndef TAVO_CORE_DETAIL_HASH_SLOT_H
 #define TAVO_CORE_DETAIL_HASH_SLOT_H
 
@@ -21,7 +21,7 @@ Word Load(const char *at)
     return word;
 }
 
-// The one to three bytes behind the last whole word, as a word; 0 when there are none.
+// The one to three bytes after the last whole word, as a word; 0 when there are none.
 inline uint32_t LastWord(std::string_view key)
 {
     const size_t left = key.size() % 4;
@@ -46,7 +46,7 @@ inline uint32_t WordSum(std::string_view key)
     return left >= 4 ? sum + Load<uint32_t>(at) : sum;
 }
 
-// A division by a number known to the compiler is a multiplication; these are the tables that every hash begins with.
+// Dividing by a constant compiles to a multiplication; every hash begins with one of these table sizes.
 inline uint32_t Modulo(uint32_t sum, uint32_t slots)
 {
     switch (slots) {
@@ -65,7 +65,7 @@ inline uint32_t Modulo(uint32_t sum, uint32_t slots)
     }
 }
 
-// The slot where the search for a key begins; -1 when the table has no slots.
+// Returns the slot where the search for a key begins; -1 when the table has no slots.
 inline int HomeSlot(std::string_view key, int slots) noexcept
 {
     return slots > 0 ? static_cast<int>(Modulo(WordSum(key), static_cast<uint32_t>(slots))) : -1;

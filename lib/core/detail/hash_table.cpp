@@ -29,8 +29,8 @@ void StoreNewPair(TLIBSZHASH *hash, int slot, std::string_view key, std::string_
     ++hash->nPair;
 }
 
-// Less than a quarter of the slots is free. The ratio is one of single-precision numbers, which only a table beyond their
-// 24 bits tells from the exact one; a division for every pair would be felt.
+// True when less than a quarter of the slots is free. The ratio is a quotient of single-precision numbers, which
+// differs from the exact one only in tables beyond their 24 bits. A division for every pair would be noticeable.
 bool IsCrowded(const TLIBSZHASH *hash)
 {
     const int free_slots = hash->nSlot - hash->nPair;
@@ -39,7 +39,7 @@ bool IsCrowded(const TLIBSZHASH *hash)
     return static_cast<float>(free_slots) / static_cast<float>(hash->nSlot) < 0.25F;
 }
 
-// The place of a key that the hash does not hold, in a table without removed pairs.
+// Finds the place of a key that the hash does not hold, in a table without removed pairs.
 int FirstFreeSlot(const TLIBSZHASH *hash, std::string_view key)
 {
     const int home = HomeSlot(key, hash->nSlot);
@@ -89,7 +89,7 @@ TLIBSZHASH *CopyToNewHash(const TLIBSZHASH *hash, int64_t slots, int64_t string_
             continue;
         const std::string_view key(hash->slots[slot].pszKey);
         const std::string_view value(hash->slots[slot].pszValue);
-        // The keys differ from each other and nothing has been removed yet, so no key needs comparing.
+        // The keys are distinct and nothing has been removed yet, so no key needs comparing.
         const int free_slot = FirstFreeSlot(copy.Get(), key);
         if (free_slot < 0 || PairBytes(key, value) > copy->nStrFree)
             return nullptr;
@@ -121,7 +121,7 @@ bool MakeHashRoom(TLIBSZHASH **hash, int64_t bytes, HashOwner &left) noexcept
 bool StorePair(TLIBSZHASH *hash, int slot, std::string_view key, std::string_view value) noexcept
 {
     HeapBlock<char> kept;
-    // A text that the hash has given up may stand just where the key goes.
+    // The new key may overwrite the text of a removed pair.
     if (Overlap(hash->pszNextStr, key.size() + 1, value.data(), value.size() + 1)) {
         kept.Reset(static_cast<char *>(std::malloc(value.size() + 1)));
         if (!kept)

@@ -1,4 +1,4 @@
-// The block of a string hash: where a key stands, how a pair is stored, how the block grows.
+// The block of a string hash: where a key is, how a pair is stored, how the block grows.
 #ifndef TAVO_CORE_DETAIL_HASH_TABLE_H
 #define TAVO_CORE_DETAIL_HASH_TABLE_H
 
@@ -28,11 +28,11 @@ inline int64_t PairBytes(std::string_view key, std::string_view value)
 
 char *StringArea(TLIBSZHASH *hash) noexcept;
 
-// The slot that holds the key, or -1.
+// Returns the slot that holds the key, or -1.
 int FindPair(const TLIBSZHASH *hash, std::string_view key) noexcept;
 
-// Where a key goes. `usual` is the slot that holds it, or the one that TLIBISetLookDict chooses; it is -1 where that
-// finds none, and `spare` then is the first free slot from the home slot on. Both are -1 in a full table.
+// Where a key goes. `usual` is the slot that holds the key, or else the one that TLIBISetLookDict chooses. If that
+// finds none, `usual` is -1 and `spare` is the first free slot from the home slot on. Both are -1 in a full table.
 struct Place {
     int usual = -1;
     int spare = -1;
@@ -42,24 +42,24 @@ struct Place {
 
 Place FindPlace(const TLIBSZHASH *hash, std::string_view key) noexcept;
 
-// An empty hash; NULL when a number is out of range or memory runs out.
+// Creates an empty hash; NULL when a number is out of range or memory runs out.
 TLIBSZHASH *NewHash(int64_t slots, int64_t string_bytes) noexcept;
 
-// The pairs in a new block; NULL when memory runs out or they do not fit.
+// Copies the pairs to a new block; NULL when memory runs out or they do not fit.
 TLIBSZHASH *CopyToNewHash(const TLIBSZHASH *hash, int64_t slots, int64_t string_bytes) noexcept;
 
-// Grows the hash by its rule for one more text of `bytes` bytes. A block that was left is handed over in `left`,
-// because the text may stand in it. False, and nothing changed, when it cannot grow.
+// Grows the hash by its rule for one more text of `bytes` bytes. Moves the old block to `left` when the hash got a new
+// one, because the caller's text may be in it. False, and nothing changed, when the hash cannot grow.
 bool MakeHashRoom(TLIBSZHASH **hash, int64_t bytes, HashOwner &left) noexcept;
 
-// Stores the pair of a new key in a free slot, there must be room. False when memory runs out: only for a value that
-// stands where the pair goes.
+// Stores the pair of a new key in a free slot; there must be room. False when memory runs out, which can only happen
+// for a value that the pair would overwrite.
 bool StorePair(TLIBSZHASH *hash, int slot, std::string_view key, std::string_view value) noexcept;
 
-// Adds the pair of a new key, which goes to `slot` (-1: a full table) unless the hash grows. The slot, or -1.
+// Adds the pair of a new key. It goes to `slot` (-1: the table is full) unless the hash grows. Returns the slot, or -1.
 int InsertNewPair(TLIBSZHASH **hash, int slot, std::string_view key, std::string_view value) noexcept;
 
-// Replaces the value of the key in `slot`. The slot, which is another when the hash has grown, or -1.
+// Replaces the value of the key in `slot`. Returns the slot, which changes when the hash grows, or -1.
 int UpdateValue(TLIBSZHASH **hash, int slot, std::string_view key, std::string_view value) noexcept;
 
 }  // namespace tavo

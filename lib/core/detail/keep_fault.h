@@ -1,4 +1,4 @@
-// Puts the error state back: for calls of our own whose failure is an ordinary answer, such as a key that is not set.
+// Restores the error state: for calls of our own whose failure is an ordinary answer, such as a key that is not set.
 #ifndef TAVO_CORE_DETAIL_KEEP_FAULT_H
 #define TAVO_CORE_DETAIL_KEEP_FAULT_H
 

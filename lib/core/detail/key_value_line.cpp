@@ -4,7 +4,7 @@
 namespace tavo {
 namespace {
 
-// The first token that is not empty and what follows its delimiter; a missing rest has no data.
+// The first non-empty token and the text after its delimiter; a missing rest has no data.
 struct Token {
     std::string_view text;
     std::string_view rest;

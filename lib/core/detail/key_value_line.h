@@ -1,4 +1,4 @@
-// One line of a settings file: what sets a key, and to what. Pure text; a line may carry its newline or not.
+// Parses one line of a settings file: which key it sets, and to what. Pure text; a line may carry its newline or not.
 #ifndef TAVO_CORE_DETAIL_KEY_VALUE_LINE_H
 #define TAVO_CORE_DETAIL_KEY_VALUE_LINE_H
 
@@ -14,7 +14,7 @@ constexpr bool IsWhiteSpace(char byte)
     return byte == '\t' || byte == '\n' || byte == '\r' || byte == ' ';
 }
 
-// Takes white space off both ends, then one pair of double quotes that encloses the rest.
+// Removes white space at both ends, then one pair of double quotes that encloses the rest.
 std::string_view TrimSetting(std::string_view text);
 
 // Callers take texts as C strings, which end at a NUL byte.
@@ -28,20 +28,21 @@ constexpr bool IsCommentLine(std::string_view line)
     return line.starts_with('#') || line.starts_with(';');
 }
 
-// The key that a line sets; empty when it sets none. Doubled and leading "=" are passed over, as ever: "=x" sets x.
+// Returns the key that a line sets; empty when it sets none. Doubled and leading "=" are skipped for compatibility:
+// "=x" sets x.
 std::string_view LineKey(std::string_view line);
 
-// The value of a line that sets a key.
+// Returns the value of a line that sets a key.
 std::string_view LineValue(std::string_view line);
 
-// What may stand in front of a key in its line.
+// Characters that may precede a key in its line.
 constexpr bool IsAroundKey(char byte)
 {
     return IsWhiteSpace(byte) || byte == '=' || byte == '"';
 }
 
-// Whether a line sets the key. Reading a file is asking this of every line: the first byte that may belong to a key
-// answers for most of them.
+// Whether a line sets the key. Readers ask this of every line of a file; the first byte that may belong to a key
+// decides most of them.
 inline bool LineSetsKey(std::string_view line, std::string_view key)
 {
     if (key.empty())
@@ -62,14 +63,14 @@ struct KeyValue {
     std::string_view value;
 };
 
-// Splits at any of the separators: the first token that is not empty is the key, the rest of the line the value, both
-// trimmed. Empty for comments and for lines that lack one of the two.
+// Splits at any of the separators: the first non-empty token is the key, the rest of the line the value, both trimmed.
+// Empty for comments and for lines without a key or value.
 std::optional<KeyValue> SplitLine(std::string_view line, std::string_view separators);
 
 // Splits at the first "="; the value may be empty. Empty for comments and for lines without a key.
 std::optional<KeyValue> SplitAtEqualSign(std::string_view line);
 
-// Whether a key that is written can be found again, and neither of the two makes lines of its own.
+// Whether a key can be found again once written, and neither text adds a line.
 bool IsWritableKey(std::string_view key);
 bool IsWritableValue(std::string_view value);
 

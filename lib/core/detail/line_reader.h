@@ -9,7 +9,7 @@
 
 namespace tavo {
 
-// Text of more than this is no settings file; it is refused as if memory had run out, before it does.
+// A settings file is never larger; a larger text is refused as if memory had run out, before memory does.
 inline constexpr size_t kLargestText = size_t{256} << 20;
 
 // Cuts the next line, with its newline if it has one, off a text.
@@ -28,10 +28,10 @@ inline std::string_view WithoutNewline(std::string_view line)
 
 class LineReader {
   public:
-    // The descriptor stays the caller's.
+    // Does not take ownership of the descriptor.
     explicit LineReader(int fd) noexcept : fd_(fd) {}
 
-    // The next line, with its newline if it has one; it stays valid until the next call. False at the end of the file
+    // Returns the next line, with its newline if it has one, valid until the next call. False at the end of the file
     // and after a read error.
     bool Next(std::string_view &line)
     {
@@ -47,7 +47,7 @@ class LineReader {
     bool Failed() const noexcept { return failed_; }
 
   private:
-    bool ReadMore();  // until a newline or the end is in the buffer; false when nothing is left
+    bool ReadMore();  // reads until the buffer holds a newline or the end; false when nothing is left
 
     int fd_;
     bool failed_ = false;

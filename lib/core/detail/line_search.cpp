@@ -1,4 +1,4 @@
-// Looks for one line of a file.
+// Searches a file for one line.
 #include "core/detail/line_search.h"
 
 #include "core/detail/key_value_line.h"

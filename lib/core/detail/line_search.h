@@ -1,4 +1,4 @@
-// Looks for one line of a file. Codes are those that the caller reports: 0, ERR_OPEN_FAILED, ERR_READ_FAILED or, when
+// Searches a file for one line. Returns codes for the caller to report: 0, ERR_OPEN_FAILED, ERR_READ_FAILED or, when
 // there is no such line, ERR_KEY_NOT_FOUND.
 #ifndef TAVO_CORE_DETAIL_LINE_SEARCH_H
 #define TAVO_CORE_DETAIL_LINE_SEARCH_H
@@ -18,8 +18,8 @@ enum class Match { first, last };
 int FindLineByNumber(const char *path, int number, FoundLine &found);
 int FindLineByKey(const char *path, std::string_view key, Match which, FoundLine &found);
 
-// Copies text with a NUL to a caller's buffer of `size` bytes: its length with the NUL. The buffer is untouched when
-// there is none, or when it is too small.
+// Copies text with a NUL to a caller's buffer of `size` bytes and returns its length with the NUL. A missing or too
+// small buffer is not touched.
 int CopyOut(std::string_view text, char *buffer, int size);
 
 }  // namespace tavo

@@ -1,4 +1,4 @@
-// The block of a string list: how it is made, how it grows.
+// The block of a string list: how it is created, how it grows.
 #include "core/detail/list_block.h"
 
 #include "core/detail/folded_text.h"
@@ -79,7 +79,7 @@ char *StoreString(TLIBSZLIST *list, const char *string, size_t length) noexcept
 {
     list->EndofFree -= length + 1;
     list->nFree -= static_cast<int32_t>(length + 1);
-    // The string may be one that this list stored and gave up.
+    // The string may be one that this list stored and removed.
     std::memmove(list->EndofFree, string, length);
     list->EndofFree[length] = '\0';
     return list->EndofFree;

@@ -1,4 +1,4 @@
-// Which items of one list are in another.
+// Finds which items of one list are in another.
 #include "core/detail/list_match.h"
 
 #include "core/detail/folded_text.h"
@@ -77,7 +77,7 @@ TLIBSZLIST *SelectItems(TLIBSZLIST *a, const TLIBSZLIST *b, bool in_new_list, bo
 {
     if (in_new_list)
         return SelectIntoNewList(a, b, found);
-    // A list selected by itself would be searched while it shrinks.
+    // If both are the same list, it would be searched while it shrinks.
     ListOwner copy;
     if (a == b) {
         copy.Reset(CopyList(b, b->nSize));

@@ -1,4 +1,4 @@
-// Which items of one list are in another: what intersection, union and difference have in common.
+// Finds which items of one list are in another, for intersection, union and difference.
 #ifndef TAVO_CORE_DETAIL_LIST_MATCH_H
 #define TAVO_CORE_DETAIL_LIST_MATCH_H
 
@@ -9,10 +9,10 @@ namespace tavo {
 // Two sorted lists can only be matched when they are sorted the same way.
 bool CanMatch(const TLIBSZLIST *a, const TLIBSZLIST *b) noexcept;
 
-// Tells for the items of one list, one after the other, whether another list holds them.
+// Checks the items of one list, one after the other, for being in another list.
 class Matcher {
   public:
-    // `mode` is the order that items are compared by; any but the two sorted ones means by bytes.
+    // `mode` is the order that items are compared by; any but the two sorted ones means bytewise.
     enum class Search { kLinear, kBinary, kMerge };
     Matcher(const TLIBSZLIST *list, int mode, Search search) : list_(list), mode_(mode), search_(search) {}
 
@@ -28,8 +28,8 @@ class Matcher {
     int walked_ = 0;
 };
 
-// The items of `a` that `b` holds (or, with `found` false, does not hold): in a new list, or in `a` itself. NULL when
-// memory runs out; `a` is then as it was.
+// Selects the items of `a` that are in `b` (with `found` false: those that are not), into a new list or in `a` itself.
+// NULL when memory runs out; `a` is then unchanged.
 TLIBSZLIST *SelectItems(TLIBSZLIST *a, const TLIBSZLIST *b, bool in_new_list, bool found) noexcept;
 
 }  // namespace tavo

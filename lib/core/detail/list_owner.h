@@ -1,4 +1,4 @@
-// Owners of a string list and a string hash. Addr() is what functions take that may move the block.
+// Owners of a string list and a string hash. Addr() is for functions that may move the block.
 #ifndef TAVO_CORE_DETAIL_LIST_OWNER_H
 #define TAVO_CORE_DETAIL_LIST_OWNER_H
 

@@ -24,13 +24,13 @@ class LockHold {
 
     explicit operator bool() const noexcept { return held_; }
 
-    // Before the scope ends, such as while a script runs that takes the lock itself.
+    // Releases before the scope ends, for example before a script runs that takes the lock itself.
     void Release() noexcept
     {
         if (!std::exchange(held_, false))
             return;
         const KeepErrno keep;
-        const KeepFault keep_fault;  // closing the file releases the lock all the same
+        const KeepFault keep_fault;  // closing the file releases the lock, too
         ErrTLIBFileUnlock(request_);
     }
 

@@ -1,4 +1,4 @@
-// Who holds a lock that could not be had.
+// Finds the holder of a lock that could not be taken.
 #include "core/detail/lock_holder.h"
 
 #include "core/detail/open_file.h"
@@ -10,8 +10,8 @@
 namespace tavo {
 namespace {
 
-// "7: FLOCK  ADVISORY  WRITE 708 00:13:1234 0 EOF": the pid when the line is about an flock of the file, else 0. Lines of
-// those who wait have "->" before the kind.
+// Parses a line such as "7: FLOCK  ADVISORY  WRITE 708 00:13:1234 0 EOF": the pid when the line is about an flock of
+// the file, else 0. Lines of waiting processes have "->" before the kind.
 pid_t HolderIn(const char *line, const struct stat &file) noexcept
 {
     int pid = 0;

@@ -1,4 +1,4 @@
-// What the model can do.
+// Reads the model's capabilities.
 #include "core/detail/model_setting.h"
 
 #include "core/detail/key_value_line.h"

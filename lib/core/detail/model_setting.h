@@ -1,4 +1,5 @@
-// What the model can do: /etc.defaults/tavoinfo.conf. Asking is no failure, so no error state is touched.
+// Reads the model's capabilities from /etc.defaults/tavoinfo.conf. A missing key is not a failure, so the error state
+// is not touched.
 #ifndef TAVO_CORE_DETAIL_MODEL_SETTING_H
 #define TAVO_CORE_DETAIL_MODEL_SETTING_H
 
@@ -10,14 +11,14 @@ namespace tavo {
 
 inline constexpr const char *kModelSettings = "/etc.defaults/tavoinfo.conf";
 
-// The value of a key; empty when the model does not say. Throws bad_alloc.
+// Returns the value of a key; empty when the file does not set it. Throws bad_alloc.
 std::optional<std::string> ModelSetting(const char *key);
 
-// Whether the model has what the key is about: "yes".
+// Whether the key's value is "yes".
 bool ModelHas(const char *key);
 
-// A number of the model, strictly decimal; UINT64_MAX for a larger one. Empty when the model does not say or says something
-// else.
+// Returns a strictly decimal number; UINT64_MAX for a larger one. Empty when the file does not set the key or sets it
+// to anything else.
 std::optional<uint64_t> ModelNumber(const char *key);
 
 }  // namespace tavo

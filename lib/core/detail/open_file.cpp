@@ -40,7 +40,7 @@ Fd OpenFd(const char *path, int flags, mode_t mode) noexcept
     }
     if (errno != EEXIST || (flags & O_EXCL) != 0)
         return Fd();
-    return Fd(OpenOnce(path, flags, mode));  // another process was faster, or a link leads to a file that is missing
+    return Fd(OpenOnce(path, flags, mode));  // another process was faster, or a link leads to a missing file
 }
 
 Fd OpenRegular(const char *path, int flags, mode_t mode) noexcept

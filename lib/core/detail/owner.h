@@ -1,5 +1,5 @@
-// Owners of what must be given back: one class a resource. Their destructors keep errno, because they run between a
-// failed call and the report that reads it.
+// Owners of resources: one class per resource. Their destructors keep errno, because they run between a failed call and
+// the report that reads it.
 #ifndef TAVO_CORE_DETAIL_OWNER_H
 #define TAVO_CORE_DETAIL_OWNER_H
 
@@ -50,7 +50,7 @@ class Fd {
         fd_ = fd;
     }
 
-    // Closes and tells whether the kernel took everything that was written.
+    // Closes; false when the kernel could not store everything that was written.
     bool Close() noexcept { return fd_ < 0 || ::close(Release()) == 0; }
 
   private:
@@ -84,14 +84,14 @@ class File {
         stream_ = stream;
     }
 
-    // Flushes, closes and tells whether everything was written.
+    // Flushes and closes; false when not everything was written.
     bool Close() noexcept { return !stream_ || std::fclose(Release()) == 0; }
 
   private:
     std::FILE *stream_ = nullptr;
 };
 
-// A block from malloc: what is handed to a caller, who releases it with free.
+// A block from malloc, for a caller that releases it with free.
 template <class T>
 class HeapBlock {
   public:

@@ -1,4 +1,4 @@
-// The environment of programs that run apart from their caller: its PATH, if it has one, and nothing else.
+// The environment of programs that run detached from their caller: its PATH, if it has one, and nothing else.
 #ifndef TAVO_CORE_DETAIL_PATH_ONLY_ENVIRONMENT_H
 #define TAVO_CORE_DETAIL_PATH_ONLY_ENVIRONMENT_H
 

@@ -13,14 +13,14 @@
 namespace tavo {
 namespace {
 
-constexpr pid_t kLargestPidEver = 4194304;  // the kernel's own limit for its setting
+constexpr pid_t kLargestPidEver = 4194304;  // the largest value of the kernel's own setting
 
 struct PidFile {
     pid_t pid;
     uid_t owner;
 };
 
-// The first bytes of an open file: a pid file is shorter.
+// Reads the first bytes of an open file: a pid file is shorter.
 std::string_view ReadStart(int fd, char *buffer, size_t size) noexcept
 {
     ssize_t got;
@@ -44,14 +44,14 @@ std::optional<PidFile> Open(const char *path) noexcept
     struct stat st;
     if (!fd || ::fstat(fd.Get(), &st) != 0)
         return std::nullopt;
-    // What others may write says whatever they like.
+    // A file that others may write to may say anything.
     if ((st.st_mode & kWritableByOthers) != 0)
         return PidFile{0, st.st_uid};
     char buffer[256];
     return PidFile{ParsePid(ReadStart(fd.Get(), buffer, sizeof buffer), LargestPid()), st.st_uid};
 }
 
-// True when the owner of the file could signal the process anyway, and when there is no such process to be harmed.
+// True when the owner of the file could signal the process anyway, and when there is no such process.
 bool MaySpeakFor(const PidFile &file) noexcept
 {
     if (file.owner == 0 || ::geteuid() != 0)
@@ -92,7 +92,8 @@ PidSignal SignalByPidFile(const char *path, int signal) noexcept
     const std::optional<PidFile> file = Open(path);
     if (!file || file->pid < 1)
         return PidSignal::no_pid;
-    // Held from before the check until the signal is sent. Old kernels and emulators have none; then the pid must do.
+    // Held from before the check until the signal is sent. Old kernels and emulators have no pidfd; then the pid has to
+    // do.
     const Fd process(static_cast<int>(::syscall(SYS_pidfd_open, file->pid, 0u)));
     if (!process && errno == ESRCH)
         return PidSignal::failed;

@@ -1,7 +1,7 @@
 // Pid files, and signals to the processes that they name.
 //
-// Root signals what a pid file says, and some pid files live in /tmp. So a file that somebody else could have written is
-// believed only about that somebody's own processes.
+// Root signals the process that a pid file names, and some pid files are in /tmp. So a file that another user could
+// have written is believed only about that user's own processes.
 #ifndef TAVO_CORE_DETAIL_PID_FILE_H
 #define TAVO_CORE_DETAIL_PID_FILE_H
 
@@ -12,10 +12,12 @@
 
 namespace tavo {
 
-// The process id on the first line of the text, blanks around it allowed; 0 when there is no number from 1 to `largest`.
+// Parses the process id on the first line of the text, with optional blanks around it; 0 without a number from 1 to
+// `largest`.
 pid_t ParsePid(std::string_view text, pid_t largest) noexcept;
 
-// The process id in a pid file; 0 when it holds none or is not to be believed; empty with errno when it cannot be opened.
+// Reads the process id in a pid file; 0 when it holds none or is not trusted; empty with errno when it cannot be
+// opened.
 std::optional<pid_t> ReadPidFile(const char *path) noexcept;
 
 enum class PidSignal {
@@ -24,8 +26,8 @@ enum class PidSignal {
     failed,  // with errno
 };
 
-// Sends the signal to the very process that the file was checked against, even if its pid is reused meanwhile. Signal 0
-// only tests.
+// Sends the signal to exactly the process that the file was checked against, even if its pid is reused meanwhile.
+// Signal 0 only tests.
 PidSignal SignalByPidFile(const char *path, int signal) noexcept;
 
 }  // namespace tavo

@@ -1,4 +1,4 @@
-// The process table as /proc shows it.
+// Reads the process table from /proc.
 #include "core/detail/process_list.h"
 
 #include "core/detail/folder_reader.h"
@@ -12,7 +12,7 @@
 namespace tavo {
 namespace {
 
-// A small file of /proc; empty when the process has gone meanwhile.
+// Reads a small file of /proc; empty when the process has gone meanwhile.
 std::string ReadSmall(int proc, const std::string &name)
 {
     std::string text;
@@ -28,7 +28,7 @@ std::string ReadSmall(int proc, const std::string &name)
     return text;
 }
 
-// What /proc/PID/stat begins with: "PID (NAME) STATE ...".
+// The beginning of /proc/PID/stat: "PID (NAME) STATE ...".
 struct Status {
     explicit Status(std::string_view text)
     {
@@ -40,14 +40,14 @@ struct Status {
         state = text[close + 2];
     }
 
-    // Ended, and kept in the table until its parent asks for the status.
+    // Ended, but kept in the table until its parent asks for the status.
     bool IsZombie() const { return state == 'Z' || state == 'X'; }
 
     std::string name;
     char state = 0;  // 0: there is no such process
 };
 
-// Empty when the process does not run any more.
+// Empty when the process no longer runs.
 std::string Command(int proc, const std::string &pid)
 {
     std::string text = ReadSmall(proc, pid + "/cmdline");
@@ -59,7 +59,7 @@ std::string Command(int proc, const std::string &pid)
             return text;
         text = "[" + status.name + "]";
     }
-    // One process is one line, whatever it calls itself.
+    // Makes one line of one process, whatever its name contains.
     std::replace(text.begin(), text.end(), '\0', ' ');
     std::replace(text.begin(), text.end(), '\n', '?');
     return text;
@@ -82,7 +82,7 @@ std::vector<Process> ListProcesses()
             processes.push_back({pid, std::move(command)});
     }
     if (proc.Failed() && errno != ENOENT)
-        throw std::bad_alloc();  // half a table would say that some do not run
+        throw std::bad_alloc();  // an incomplete table would hide running processes
     std::sort(processes.begin(), processes.end(), [](const Process &a, const Process &b) { return a.pid < b.pid; });
     return processes;
 }

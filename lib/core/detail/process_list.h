@@ -1,4 +1,4 @@
-// The process table as /proc shows it.
+// Reads the process table from /proc.
 #ifndef TAVO_CORE_DETAIL_PROCESS_LIST_H
 #define TAVO_CORE_DETAIL_PROCESS_LIST_H
 
@@ -12,21 +12,21 @@ namespace tavo {
 
 struct Process {
     pid_t pid;
-    std::string command;  // the arguments joined by blanks, or "[NAME]" of a process without any (a kernel thread)
+    std::string command;  // the arguments joined by blanks; "[NAME]" of a process without any (a kernel thread)
 };
 
-// Every process that runs, the caller's own too, by ascending pid; those that have ended and wait for their parent are left
-// out. Empty when there is no /proc. Throws bad_alloc.
+// Lists the running processes, the caller's own too, by ascending pid, without zombies. Empty when there is no /proc.
+// Throws bad_alloc.
 std::vector<Process> ListProcesses();
 
-// Whether the process has ended and only waits for its parent to ask for its status. Throws bad_alloc.
+// Whether the process is a zombie. Throws bad_alloc.
 bool IsZombie(pid_t pid);
 
-// The line that a process table shows for it: "PID ARGUMENTS".
+// Returns the line of the process in a process table: "PID ARGUMENTS".
 std::string ProcessLine(const Process &process);
 
-// The pids of the processes whose line holds the text, which is plain text: "[nfsd]" finds just those threads. The
-// caller's own process counts, if it matches. Throws bad_alloc.
+// Lists the pids of the processes whose line contains the text literally: "[nfsd]" finds just those threads. The
+// caller's own process counts if it matches. Throws bad_alloc.
 std::vector<pid_t> FindProcesses(std::string_view text);
 
 }  // namespace tavo

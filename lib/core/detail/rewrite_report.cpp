@@ -1,4 +1,4 @@
-// Rewrites files for exported functions and reports what went wrong under their module names.
+// Rewrites files for exported functions and reports failures under their module names.
 #include "core/detail/rewrite_report.h"
 
 #include "core/detail/guard.h"
@@ -28,7 +28,7 @@ int ReadOrFail(FileRewrite &rewrite, const char *path, std::string &text, Where 
     if (const int code = rewrite.Open(path))
         return Fail(code, where);
     return rewrite.Read(text) ? 0
-                              : Fail(ERR_WRITE_FAILED, where);  // the one code of everything between open and rename
+                              : Fail(ERR_WRITE_FAILED, where);  // the one code for everything between open and rename
 }
 
 int RewriteText(const char *path, Missing missing, TextEdit edit, Where where) noexcept

@@ -1,4 +1,4 @@
-// How an exported function rewrites a file and reports what went wrong, under its own module name.
+// How an exported function rewrites a file and reports a failure under its own module name.
 #ifndef TAVO_CORE_DETAIL_REWRITE_REPORT_H
 #define TAVO_CORE_DETAIL_REWRITE_REPORT_H
 
@@ -18,18 +18,18 @@ void LogUnsyncedDirectory(const FileRewrite &rewrite, Where where = Where());
 // 0, or -1 with the code set.
 int ReplaceOrFail(FileRewrite &rewrite, std::string_view text, Where where = Where());
 
-// Opens a file that is to be rewritten and reads it. 0, or -1 with the code set.
+// Opens a file to be rewritten and reads it. 0, or -1 with the code set.
 int ReadOrFail(FileRewrite &rewrite, const char *path, std::string &text, Where where = Where());
 
 enum class Missing { fail, create };
 
-// Takes the old text and returns the new one, or nothing when the line or key that it is about is not there.
+// Takes the old text and returns the new one, or nothing when the line or key to be edited is not there.
 using TextEdit = FunctionRef<std::optional<std::string>(std::string_view text)>;
 
 // Rewrites a file by an edit of its whole text. 1, 0 with ERR_KEY_NOT_FOUND, -1 with another code.
 int RewriteText(const char *path, Missing missing, TextEdit edit, Where where = Where()) noexcept;
 
-// The same by a line that the caller gives, without its newline or with it.
+// The same for a line from the caller, with or without its newline.
 using LineEdit = FunctionRef<std::optional<std::string>(std::string_view text, std::string_view line)>;
 int RewriteWithLine(const char *path, const char *argument, LineEdit edit, Where where = Where()) noexcept;
 

@@ -1,4 +1,4 @@
-// Runs a composed command line through the shell and gives its exit status.
+// Runs a composed command line through the shell and returns its exit status.
 #include "core/detail/run_command.h"
 
 #include "core/detail/child_process.h"

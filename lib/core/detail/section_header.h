@@ -14,7 +14,7 @@ constexpr bool IsSectionHeader(std::string_view line)
     return line.starts_with('[') && line[last] == ']';
 }
 
-// There must be no white space inside the brackets, and nothing else after them.
+// White space inside the brackets and text after them are not allowed.
 constexpr bool HeadsSection(std::string_view line, std::string_view name)
 {
     const size_t closing = name.size() + 1;
@@ -22,7 +22,7 @@ constexpr bool HeadsSection(std::string_view line, std::string_view name)
            line[closing] == ']' && line.find_first_not_of(kWhiteSpace, closing + 1) == line.npos;
 }
 
-// Whether a header with this name is found again.
+// Whether a header with this name can be found again.
 constexpr bool IsWritableSectionName(std::string_view name)
 {
     return name.find_first_of("]\n\r") == name.npos;

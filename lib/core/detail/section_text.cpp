@@ -9,7 +9,7 @@
 namespace tavo {
 namespace {
 
-// What a memory stream has written; freed after the stream is closed.
+// The text written to a memory stream; freed after the stream is closed.
 struct Memory {
     Memory() = default;
     ~Memory() { std::free(text); }
@@ -32,7 +32,7 @@ std::optional<std::string> SectionText(const char *name, const TLIBSZHASH *pairs
         return std::nullopt;
     if (std::fflush(stream.Get()) != 0)
         throw std::bad_alloc();
-    return std::string(memory.text, memory.length);  // not after the close, which drops a text that it cannot shrink
+    return std::string(memory.text, memory.length);  // before the close, which drops a text that it cannot shrink
 }
 
 }  // namespace tavo

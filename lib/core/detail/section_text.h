@@ -1,4 +1,4 @@
-// A section as text: what ErrTLIBIFileHash2File writes.
+// A section as text, in the format of ErrTLIBIFileHash2File.
 #ifndef TAVO_CORE_DETAIL_SECTION_TEXT_H
 #define TAVO_CORE_DETAIL_SECTION_TEXT_H
 
@@ -9,7 +9,7 @@
 
 namespace tavo {
 
-// Empty when it cannot be written; the error state then says why.
+// Empty when it cannot be written; the error state then has the reason.
 std::optional<std::string> SectionText(const char *name, const TLIBSZHASH *pairs, const char *format);
 
 }  // namespace tavo

@@ -1,4 +1,4 @@
-// Edits of a settings file's whole text. Lines that an edit is not about keep every byte.
+// Edits of a settings file's whole text. All other lines keep every byte.
 #ifndef TAVO_CORE_DETAIL_SETTINGS_TEXT_H
 #define TAVO_CORE_DETAIL_SETTINGS_TEXT_H
 
@@ -8,7 +8,7 @@
 
 namespace tavo {
 
-// A line's place in a text, its newline included.
+// A line's place in a text, including its newline.
 struct LineSpan {
     size_t begin;
     size_t length;
@@ -17,17 +17,18 @@ struct LineSpan {
 std::optional<LineSpan> LineByNumber(std::string_view text, int number);  // from 1
 std::optional<LineSpan> LineByKey(std::string_view text, std::string_view key);
 
-// The text with `line` in place of the span, or before it; empty when there is no such span.
+// Returns the text with `line` in place of the span, or before it; empty when there is no such span.
 std::optional<std::string> WithLine(std::string_view text, std::optional<LineSpan> span, std::string_view line);
 std::optional<std::string> WithLineBefore(std::string_view text, std::optional<LineSpan> span, std::string_view line);
 
-// Appends a line; a last line that lacks its newline gets it first, or the two would become one.
+// Appends a line. A last line without its newline gets it first; otherwise the two would become one.
 void AppendLine(std::string &text, std::string_view line);
 
-// The text with `line` in place of the key's first line, without its later ones; without any, the line is appended.
+// Returns the text with `line` in place of the key's first line and without its later ones; without any, the line is
+// appended.
 std::string WithKey(std::string_view text, std::string_view key, std::string_view line);
 
-// A line argument with its newline; empty when it holds another newline.
+// Returns a line argument with its newline; empty when it contains another newline.
 std::optional<std::string> OneLine(std::string_view argument);
 
 }  // namespace tavo

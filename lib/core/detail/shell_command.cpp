@@ -13,7 +13,7 @@ bool IsPlain(char byte)
            std::string_view("_@%+=:,./-").find(byte) != std::string_view::npos;
 }
 
-// What may stand between two single quotes: a quote itself ends the first pair, stands escaped, and opens another.
+// Quotes text for the space between two single quotes: a quote ends the first pair, is escaped, and opens another.
 std::string WithinQuotes(std::string_view text)
 {
     std::string quoted;

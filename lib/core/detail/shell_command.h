@@ -1,7 +1,8 @@
 // Composes command lines for the shell from fixed formats.
 //
-// An argument of plain characters goes in as it is, so that the command is byte for byte the one that administrators
-// find in logs and write in scripts; any other is quoted, so that no name, path or address becomes shell syntax.
+// An argument of plain characters is inserted unchanged, so that the command is byte for byte the one that
+// administrators find in logs and use in scripts. Any other argument is quoted, so that no name, path or address
+// becomes shell syntax.
 //
 //     ShellCommand("/sbin/pvresize %s > /dev/null 2>&1", device)
 #ifndef TAVO_CORE_DETAIL_SHELL_COMMAND_H
@@ -18,8 +19,8 @@
 
 namespace tavo {
 
-// A piece of the command that the library itself composed, such as a fixed option or a list of quoted devices: it goes in
-// unquoted and may start with "-". Never for text from outside.
+// A piece of the command that the library itself composed, such as a fixed option or a list of quoted devices. It is
+// inserted unquoted and may start with "-". Never for text from outside.
 struct ComposedPiece {
     std::string_view text;
 };
@@ -38,15 +39,15 @@ TextArg AsTextArg(const Value &value)
     return value;
 }
 
-// Formats as FormatText does; "%s" may stand within single quotes. Empty when a text argument starts with "-", where a
-// program would take it for an option, or holds a NUL byte. Throws bad_alloc.
+// Formats as FormatText does; "%s" may be inside single quotes. Empty when a text argument contains a NUL byte or
+// starts with "-", where a program would read it as an option. Throws bad_alloc.
 template <class... Args>
 std::optional<std::string> ShellCommand(FormatFor<Args...> format, const Args &...args)
 {
     return ComposeShellCommand(format.Text(), {AsTextArg(args)...}, {std::is_same_v<Args, ComposedPiece>...});
 }
 
-// The text as one word of the shell: itself when all its characters are plain, else quoted.
+// Returns the text as one word of the shell: unchanged when all its characters are plain, else quoted.
 std::string ShellQuoted(std::string_view text);
 
 }  // namespace tavo

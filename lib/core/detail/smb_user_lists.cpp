@@ -11,7 +11,7 @@ namespace {
 constexpr std::array<std::string_view, 5> kLists{"validusers", "invalidusers", "readlist", "writelist", "adminusers"};
 constexpr std::string_view kSeparators = ", \t\\\r\n";  // a backslash continues the line
 
-// Samba takes parameter names in any case and with any blanks.
+// Samba accepts parameter names in any case and with any blanks.
 bool IsUserList(std::string_view name)
 {
     std::string plain;
@@ -21,7 +21,7 @@ bool IsUserList(std::string_view name)
     return std::find(kLists.begin(), kLists.end(), plain) != kLists.end();
 }
 
-// The end of the line that begins at `at`, continuation lines included.
+// Finds the end of the line that begins at `at`, continuation lines included.
 size_t EndOfLogicalLine(std::string_view text, size_t at)
 {
     for (;;) {
@@ -37,7 +37,7 @@ size_t EndOfLogicalLine(std::string_view text, size_t at)
     }
 }
 
-// One name of a list as it is spelled: "@" or "+" (a group) and quotes around it or around its name.
+// One name of a list as written: with "@" or "+" (a group) and quotes around it or around its name.
 struct Entry {
     std::string_view spelled;
     std::string_view name;
@@ -82,7 +82,7 @@ std::string Respelled(const Entry &entry, const std::string &name)
 std::string ChangeList(std::string_view list, const NameChange &change)
 {
     std::string out;
-    size_t first_name = std::string::npos;  // where the first name that stays begins
+    size_t first_name = std::string::npos;  // where the first kept name begins
     while (!list.empty()) {
         const size_t gap = std::min(list.find_first_not_of(kSeparators), list.size());
         out.append(list.substr(0, gap));
@@ -99,7 +99,7 @@ std::string ChangeList(std::string_view list, const NameChange &change)
                    comma != out.npos && out[comma] == ',' && first_name != out.npos) {
             out.resize(comma);  // with the comma before it
         } else {
-            list.remove_prefix(std::min(list.find_first_not_of(", \t"), list.size()));  // or the one behind it
+            list.remove_prefix(std::min(list.find_first_not_of(", \t"), list.size()));  // or the one after it
         }
     }
     return out;

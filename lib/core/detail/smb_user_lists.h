@@ -9,10 +9,10 @@
 
 namespace tavo {
 
-// What becomes of a name in a list: nothing (empty optional), another name, or "" to take it out.
+// Maps a name in a list: nothing (empty optional) keeps it, another name replaces it, "" removes it.
 using NameChange = std::function<std::optional<std::string>(std::string_view name, bool is_group)>;
 
-// The file with every name in a user list changed; all else is the same text.
+// Returns the file with the names in its user lists changed; all other text is unchanged.
 std::string ChangeSmbUserLists(std::string_view text, const NameChange &change);
 
 }  // namespace tavo

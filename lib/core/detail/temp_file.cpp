@@ -1,4 +1,4 @@
-// A temporary file's way into its target's place.
+// Moves a temporary file into its target's place.
 #include "core/detail/temp_file.h"
 
 #include "core/detail/file_target.h"
@@ -35,8 +35,8 @@ uint32_t HashOf(std::string_view text) noexcept
     return hash;
 }
 
-// Three random characters, and three that follow from the name so far: "hosts.backup" is somebody's file and must not
-// be taken for a dead temporary file of "hosts".
+// Three random characters, and three that follow from the name so far: "hosts.backup" is a user's file and must not be
+// mistaken for a stale temporary file of "hosts".
 std::string TempName(std::string_view target_name, std::string_view random)
 {
     std::string name(target_name);
@@ -57,12 +57,12 @@ std::string_view LastPart(std::string_view path) noexcept
     return path.substr(path.rfind('/') + 1);  // npos + 1 is 0
 }
 
-// The holder of the lock decides about the file; a death frees it.
+// The lock's holder owns the file; a death releases it.
 bool LockTemp(int fd) noexcept
 {
     while (::flock(fd, LOCK_EX | LOCK_NB) != 0) {
         if (errno != EINTR)
-            return errno != EWOULDBLOCK;  // on a file system without locks nobody takes any, either
+            return errno != EWOULDBLOCK;  // on a file system without locks no other process takes any
     }
     return true;
 }
@@ -81,7 +81,7 @@ bool IsDead(int fd, int directory, const char *name) noexcept
            IsNamed(fd, directory, name);
 }
 
-// A process that was killed in a rewrite of the target has left its temporary file.
+// Removes the temporary file of a process that was killed while it rewrote the target.
 void RemoveDead(const std::string &target)
 {
     FolderReader folder(DirectoryOf(target).c_str());
@@ -116,7 +116,7 @@ bool TempFile::CreateBeside(const std::string &target)
             continue;
         if (!fd_)
             break;
-        // Between the two calls another process may have found it dead.
+        // Another process may have removed it as stale between the two calls.
         if (LockTemp(fd_.Get())) {
             errno = 0;
             if (IsNamed(fd_.Get(), AT_FDCWD, path_.c_str()))

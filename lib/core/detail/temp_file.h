@@ -1,4 +1,4 @@
-// A file beside another one, which it is to replace.
+// A temporary file beside the file that it will replace.
 #ifndef TAVO_CORE_DETAIL_TEMP_FILE_H
 #define TAVO_CORE_DETAIL_TEMP_FILE_H
 
@@ -8,8 +8,8 @@
 
 namespace tavo {
 
-// A file that is to take another one's place. Unless it does, it is removed again. While its process lives it is locked
-// (flock); one that is not was left by a process that was killed, and the next rewrite of the same target removes it.
+// A file that will take another one's place; otherwise it is removed. While its process lives it is locked (flock). The
+// next rewrite of the same target removes unlocked ones, which killed processes have left.
 class TempFile {
   public:
     TempFile() = default;
@@ -20,14 +20,14 @@ class TempFile {
     // Creates the target's path followed by a dot and six characters, mode 0600. Throws bad_alloc.
     bool CreateBeside(const std::string &target);
 
-    // Takes over a file that the caller created.
+    // Takes ownership of a file that the caller created.
     void Adopt(Fd fd, std::string path);
 
     int Descriptor() const noexcept { return fd_.Get(); }
     Fd &File() noexcept { return fd_; }
     const std::string &Path() const noexcept { return path_; }
 
-    // Closes; false when the kernel could not take everything. The lock stays.
+    // Closes; false when the kernel could not store everything. The lock stays.
     bool Close() noexcept;
 
     bool RenameTo(const std::string &target) noexcept;

@@ -1,5 +1,5 @@
-// Fills printf-like formats with typed arguments. Log lines and command lines are fixed as such formats; what differs
-// between them is how an argument's text goes in, so that is the writer's choice.
+// Fills printf-like formats with typed arguments. Log lines and command lines are fixed as such formats; they differ in
+// how an argument's text is inserted, so the writer decides that.
 #ifndef TAVO_CORE_DETAIL_TEXT_FORMAT_H
 #define TAVO_CORE_DETAIL_TEXT_FORMAT_H
 
@@ -58,8 +58,8 @@ class TextWriter {
     ~TextWriter() = default;
 };
 
-// Understands %s, %c, %d, %i, %u, %x and %X with a zero flag, a width and the length modifiers (which the typed
-// arguments make superfluous), and %%. A conversion without an argument is written as it stands.
+// Supports %s, %c, %d, %i, %u, %x and %X with a zero flag, a width and the length modifiers (which the typed arguments
+// make superfluous), and %%. A conversion without an argument is copied unchanged.
 void FormatText(TextWriter &out, const char *format, std::initializer_list<TextArg> args);
 
 }  // namespace tavo

@@ -1,4 +1,4 @@
-// What a tool says on its standard error while it runs for the library.
+// Logs the standard error of tools that the library runs.
 #include "core/detail/tool_words.h"
 
 #include "core/detail/child_process.h"
@@ -35,7 +35,7 @@ int ToolWords::Descriptor() const noexcept
 void ToolWords::Log() const noexcept
 {
     const KeepErrno keep;
-    char text[2048];  // the rest of what a tool says is repetition
+    char text[2048];  // the rest of a tool's messages is repetition
     const ssize_t size = memory_ ? ::pread(memory_.Get(), text, sizeof text, 0) : 0;
     std::string_view words(text, size > 0 ? static_cast<size_t>(size) : 0);
     while (!words.empty()) {

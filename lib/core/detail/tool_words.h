@@ -1,5 +1,5 @@
-// What a tool says on its standard error while it runs for the library. It goes to the system log, at debug priority, when
-// this object goes: after the lines of the function that ran the tool, and never to the caller's own standard error.
+// The standard error of a tool that the library runs. The destructor writes it to the system log at debug priority:
+// after the lines of the function that ran the tool, and never to the caller's own standard error.
 #ifndef TAVO_CORE_DETAIL_TOOL_WORDS_H
 #define TAVO_CORE_DETAIL_TOOL_WORDS_H
 
@@ -14,13 +14,13 @@ class ToolWords {
     ToolWords &operator=(ToolWords &&other) noexcept;
     ~ToolWords();
 
-    // The standard error of the tool's process.
+    // Returns the descriptor to be the tool's standard error.
     int Descriptor() const noexcept;
 
   private:
     void Log() const noexcept;
 
-    Fd memory_;  // a file without a name; none where the kernel has no such files: then the words are lost
+    Fd memory_;  // a file without a name; where the kernel has no such files, the messages are lost
 };
 
 }  // namespace tavo

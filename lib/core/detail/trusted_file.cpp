@@ -13,10 +13,11 @@
 namespace tavo {
 namespace {
 
-// Names that cannot be guessed need no second try, except on a machine whose random source is not ready.
+// Random names need no second try, except on a machine whose random source is not ready.
 constexpr int kAsideTries = 16;
 
-// Never replaces another name; kernels and file systems without such a rename replace one that nobody could guess.
+// Never replaces another file. Where the kernel or file system lacks such a rename, the new name is at least a random
+// one.
 bool RenameAside(const char *from, const char *to) noexcept
 {
     if (::renameat2(AT_FDCWD, from, AT_FDCWD, to, RENAME_NOREPLACE) == 0)
@@ -84,7 +85,7 @@ std::string MoveForeignAside(const std::string &path)
         }
         if (::lstat(aside.c_str(), &moved) == 0 && (IsSameFile(seen, moved) || !IsTrusted(moved)))
             return aside;
-        // Another process has put things right in between: that one's goes back.
+        // Another process has cleared the name in between; its own file goes back.
         RenameAside(aside.c_str(), path.c_str());
     }
     return {};

@@ -8,7 +8,7 @@
 namespace tavo {
 namespace {
 
-// The base names of the library's files, sorted; written by the build from its list of sources.
+// The base names of the library's files, sorted; the build writes them from its list of sources.
 constexpr const char *kModules[] = {
 #include "core/detail/modules.inc"
 };

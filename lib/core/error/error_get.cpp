@@ -1,4 +1,4 @@
-// Hands out the code of the last failure.
+// Returns the code of the last failure.
 #include "tavo_error.h"
 
 extern "C" int TLIBErrGet(void)

@@ -1,4 +1,4 @@
-// Hands out the module that recorded the last failure.
+// Returns the module that recorded the last failure.
 #include "tavo_error.h"
 
 #include "core/detail/fault.h"

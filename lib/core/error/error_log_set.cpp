@@ -9,8 +9,8 @@
 
 namespace {
 
-// The message used to be a format without arguments, so "%%" is one percent sign; every other "%" has nothing to
-// convert and stands for itself.
+// The message used to be a format without arguments: "%%" is one percent sign, and every other "%" has nothing to
+// convert and is copied.
 std::string LogLine(std::string_view message)
 {
     std::string line;

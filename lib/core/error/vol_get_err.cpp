@@ -1,4 +1,4 @@
-// Hands out the volume module's own error cell.
+// Returns the volume module's own error cell.
 #include "tavo_error.h"
 
 extern "C" int TAVOVolGetErr(void)

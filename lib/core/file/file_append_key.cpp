@@ -10,12 +10,12 @@
 
 namespace {
 
-// With one line; through a rewrite too, so that nobody ever sees the file empty.
+// The file with this one line. It is created by a rewrite, too, so that no reader ever sees it empty.
 int CreateWith(const char *path, const std::string &line)
 {
     tavo::FileRewrite rewrite;
     rewrite.Open(path);
-    if (!rewrite.IsMissing())  // it has come to be since
+    if (!rewrite.IsMissing())  // another process has created it since
         return Fail(ERR_OPEN_FAILED);
     const int code = rewrite.Replace(line);
     if (code == ERR_WRITE_FAILED)

@@ -1,4 +1,4 @@
-// Tells whether a file sets a key to a value.
+// Checks whether a file sets a key to a value.
 #include "tavo_file.h"
 
 #include "core/detail/guard.h"

@@ -39,7 +39,7 @@ int Lock(const tavo::Fd &fd)
     return 0;
 }
 
-// Whether the path still names that file, and nobody else has it.
+// Checks that the path still names that file, and that no other process has it.
 bool IsScratch(const tavo::Fd &fd)
 {
     struct stat open_file, named;
@@ -47,7 +47,7 @@ bool IsScratch(const tavo::Fd &fd)
            open_file.st_ino == named.st_ino && open_file.st_uid == ::geteuid() && open_file.st_nlink == 1;
 }
 
-// Removes the file of a process that died. Anything else of that name is not ours and stays.
+// Removes the file of a process that died. Anything else of that name belongs to others and stays.
 bool RemoveStale()
 {
     const tavo::Fd fd = tavo::OpenRegular(kScratch, O_RDONLY | O_NOFOLLOW);
@@ -65,7 +65,7 @@ tavo::Fd CreateScratch()
     const int error = Lock(fd);
     if (error == 0 && IsScratch(fd))
         return fd;
-    // When it is locked already, another process has just found it stale, and removes it.
+    // If it is locked by now, another process has just found it stale and removes it.
     if (error != 0 && error != EWOULDBLOCK && IsScratch(fd))
         ::unlink(kScratch);
     return tavo::Fd();
@@ -77,10 +77,10 @@ bool OnSameFileSystem(int fd, const std::string &path)
     return ::fstat(fd, &scratch) == 0 && ::stat(path.c_str(), &target) == 0 && scratch.st_dev == target.st_dev;
 }
 
-// False when the scratch file cannot serve; then the file is rewritten as every other one.
+// False when the scratch file cannot be used; then the file is rewritten like any other.
 bool ReplaceByScratch(tavo::FileRewrite &rewrite, std::string_view text)
 {
-    std::string path = kScratch;            // before the file: what is made must find its owner
+    std::string path = kScratch;            // allocated first: once created, the file needs its owner
     const tavo::Fd lock = CreateScratch();  // held beyond the rename
     if (!lock)
         return false;

@@ -12,7 +12,7 @@
 
 namespace {
 
-// Takes a key off the list of wanted ones; false when it was not on it.
+// Removes a key from the list of wanted ones; false when it was not on it.
 bool TakeWanted(TLIBSZLIST *wanted, const std::string &key)
 {
     bool taken = false;

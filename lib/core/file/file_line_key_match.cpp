@@ -1,4 +1,4 @@
-// Tells whether a line sets a key.
+// Checks whether a line sets a key.
 #include "tavo_file.h"
 
 #include "core/detail/fault.h"

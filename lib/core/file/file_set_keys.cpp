@@ -19,7 +19,7 @@ std::optional<std::string> PairLine(const char *key, const char *value, const ch
     return tavo::FormatLine(format, key, value);
 }
 
-// The pairs that are still to be written: a copy of the caller's hash, emptied line by line.
+// The pairs yet to be written: a copy of the caller's hash, emptied line by line.
 class PairsLeft {
   public:
     PairsLeft(const TLIBSZHASH *pairs, const char *format)
@@ -31,7 +31,7 @@ class PairsLeft {
 
     bool Knows(const std::string &key) const { return SzTLIBSzHashGetValue(pairs_, key.c_str()) != nullptr; }
 
-    // The key's line; empty when it was taken already.
+    // Returns the key's line; empty when an earlier line has used it.
     std::string TakeLine(const char *key)
     {
         if (!SzTLIBSzHashGetValue(left_.Get(), key))

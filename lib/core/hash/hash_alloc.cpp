@@ -1,4 +1,4 @@
-// Makes an empty hash of the usual size.
+// Creates an empty hash of the usual size.
 #include "tavo_hash.h"
 
 namespace {

@@ -1,4 +1,4 @@
-// Makes an empty hash of any size.
+// Creates an empty hash of any size.
 #include "tavo_hash.h"
 
 #include "core/detail/fault.h"

@@ -1,4 +1,4 @@
-// Makes an empty list.
+// Creates an empty list.
 #include "tavo_list.h"
 
 #include "core/detail/fault.h"

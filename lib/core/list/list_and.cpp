@@ -1,4 +1,4 @@
-// Keeps the items of a list that another list holds.
+// Keeps the items of a list that are also in another list.
 #include "tavo_list.h"
 
 #include "core/detail/fault.h"

@@ -1,4 +1,4 @@
-// Drops the holes of a list.
+// Removes the holes of a list.
 #include "tavo_list.h"
 
 #include "core/detail/list_block.h"

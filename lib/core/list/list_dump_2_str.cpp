@@ -45,7 +45,7 @@ extern "C" int TLIBSzListDump2Str(const TLIBSZLIST *pList, const char *szSep, ch
             return Fail(ERR_TRUNCATED, Line{50});
         if (!joined.Append(item))
             return Fail(ERR_TRUNCATED, Line{50});
-        // Callers use the count as a mark of success; it has only ever grown with the separators of empty items.
+        // Callers use the count as a sign of success. It has only ever counted the separators of empty items.
         if (i > 0 && !*item)
             count += std::strlen(szSep);
     }

@@ -1,4 +1,4 @@
-// Adds the items of one list to another that lacks them.
+// Adds to a list the items of another list that it lacks.
 #include "tavo_list.h"
 
 #include "core/detail/guard.h"
@@ -12,7 +12,7 @@ namespace {
 
 using tavo::Matcher;
 
-// What `b` holds and `a` does not, decided before anything is added, so that both forms of the union agree.
+// The items that are in `b` but not in `a`, found before anything is added, so that both forms of the union agree.
 struct Missing {
     std::vector<const char *> items;
     int64_t bytes = 0;

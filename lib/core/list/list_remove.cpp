@@ -1,4 +1,4 @@
-// Takes an item out of a list: at an index, the first, the last.
+// Removes an item of a list: at an index, the first, the last.
 #include "tavo_list.h"
 
 #include "core/detail/fault.h"

@@ -13,8 +13,8 @@ extern "C" int TLIBSzListSet(TLIBSZLIST **ppList, int i, const char *sz)
     if (tavo::IsSorted(*ppList) && !(tavo::CanOrder(*ppList, (*ppList)->fMode) && tavo::CanPlace(*ppList, sz)))
         return Fail(ERR_BAD_PARAMETERS);
     const size_t length = std::strlen(sz);
-    // In place it goes over the old text. A hole has no text, so only "" ever lands on the empty string that all
-    // holes share.
+    // In place, the new text overwrites the old one. A hole has no text, so only "" is ever written to the empty string
+    // that all holes share.
     if (length > std::strlen((*ppList)->pszItem[i])) {
         tavo::ListOwner left;
         if (!tavo::MakeListRoom(ppList, static_cast<int64_t>(length) + 1, left))
@@ -28,6 +28,6 @@ extern "C" int TLIBSzListSet(TLIBSZLIST **ppList, int i, const char *sz)
         return i;
     const char *stored = list->pszItem[i];
     tavo::SortItems(list, list->fMode);
-    // For a list sorted without regard to case this refuses, as callers know it, after the item has been replaced.
+    // In a list sorted without regard to case this fails after the item has been replaced; callers rely on that.
     return TLIBSzListFind(list, stored);
 }

@@ -1,4 +1,4 @@
-// Tells how a list is sorted.
+// Returns how a list is sorted.
 #include "tavo_list.h"
 
 #include "core/detail/fault.h"

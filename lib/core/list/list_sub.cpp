@@ -1,4 +1,4 @@
-// Keeps the items of a list that another list does not hold.
+// Keeps the items of a list that are not in another list.
 #include "tavo_list.h"
 
 #include "core/detail/fault.h"

@@ -1,4 +1,4 @@
-// Drops every inherited lock in a freshly forked child.
+// Closes every inherited lock in a freshly forked child.
 #include "tavo_lock.h"
 
 #include "core/detail/fault.h"
@@ -8,7 +8,7 @@ extern "C" int ErrTLIBFileCloseLock(void)
 {
     int result = 0;
     for (TLIBLOCKFILE *entry = rgslckList; entry->fLockBit != 0; ++entry) {
-        // Closing only: to unlock would free the parent's lock, which belongs to the same open file.
+        // Only closes: unlocking would release the parent's lock, which belongs to the same open file.
         tavo::File stream(std::exchange(entry->pfLock, nullptr));
         entry->nRef = 0;
         if (!stream.Close())

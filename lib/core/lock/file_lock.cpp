@@ -22,14 +22,14 @@ constexpr int kTicksPerRetry = 5;
 
 enum class Take { taken, not_opened, not_allowed, busy };
 
-// Hopeless is what waiting cannot help: this process itself holds a shared lock that would have to become exclusive, or
-// it may not open the file.
+// Hopeless: waiting cannot help, because this process itself holds a shared lock that would have to become exclusive,
+// or because it may not open the file.
 enum class Attempt { complete, incomplete, hopeless };
 
 // One attempt at a request.
 struct Taken {
-    unsigned locks = 0;                    // to be given back unless the attempt is complete
-    const TLIBLOCKFILE *missed = nullptr;  // the first lock that could not be had
+    unsigned locks = 0;                    // given back unless the attempt completes
+    const TLIBLOCKFILE *missed = nullptr;  // the first lock that could not be taken
     int error = 0;                         // why its file could not be opened
 };
 
@@ -56,13 +56,13 @@ bool Flock(int fd, unsigned mode)
     int result;
     do
         result = ::flock(fd, static_cast<int>(mode));
-    while (result != 0 && errno == EINTR);  // a child that died is no answer about the lock
+    while (result != 0 && errno == EINTR);  // a child's death says nothing about the lock
     return result == 0;
 }
 
 Take TakeFile(TLIBLOCKFILE &entry, unsigned mode)
 {
-    // A cleaner of /tmp may replace the file between open and flock; then the lock excludes nobody.
+    // A cleaner of /tmp may replace the file between open and flock; then the lock excludes no other process.
     for (int tries = 0; tries < 10; ++tries) {
         Fd fd = tavo::OpenRegular(entry.szPath, O_RDONLY | O_NOFOLLOW);
         if (!fd && errno == EACCES)
@@ -115,7 +115,7 @@ Attempt TakeAll(unsigned wanted, unsigned mode, Taken &taken)
     return taken.locks == wanted ? Attempt::complete : Attempt::incomplete;
 }
 
-// Without this line nobody finds out which of a dozen programs keeps the others waiting.
+// Without this line an administrator cannot find out which of a dozen programs blocks the others.
 void LogMissed(const Taken &taken)
 {
     if (!taken.missed)

@@ -1,4 +1,4 @@
-// Keeps some of the inherited locks in a freshly forked child and drops the others.
+// Keeps some of the inherited locks in a freshly forked child and closes the others.
 #include "tavo_lock.h"
 
 #include "core/detail/fault.h"
@@ -12,7 +12,7 @@ extern "C" int ErrTLIBFileResetLock(unsigned int mask)
             entry->nRef = 1;
             continue;
         }
-        // Closing only: to unlock would free the parent's lock, which belongs to the same open file.
+        // Only closes: unlocking would release the parent's lock, which belongs to the same open file.
         tavo::File stream(std::exchange(entry->pfLock, nullptr));
         entry->nRef = 0;
         if (!stream.Close())

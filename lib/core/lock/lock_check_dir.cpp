@@ -1,7 +1,7 @@
 // Creates the directory of the lock files and every lock file that is missing.
 //
-// Everybody may create names in /tmp, before the appliance does. Root follows no link there, waits for no FIFO, takes no
-// lock in a directory in which somebody else could exchange the files, and moves a stranger's directory out of the way.
+// Everybody may create names in /tmp, also before the appliance does. Root follows no link there, waits for no FIFO,
+// takes no lock in a directory in which another user could exchange the files, and renames other users' directories.
 #include "tavo_lock.h"
 
 #include "core/detail/guard.h"
@@ -14,8 +14,8 @@ using tavo::Fd;
 
 constexpr char kDirectory[] = "/tmp/lock";
 constexpr mode_t kDirectoryMode = 0755;
-constexpr mode_t kFileMode = 0600;  // whoever may read the file may hold its lock for ever
-constexpr int kTries = 64;          // against somebody who takes the name again and again
+constexpr mode_t kFileMode = 0600;  // every reader of the file could hold its lock for ever
+constexpr int kTries = 64;          // against a user who takes the name again and again
 
 bool IsOwnerTrusted(const struct stat &st)
 {
@@ -58,7 +58,7 @@ bool IsLockFile(int directory, const char *name)
     struct stat st;
     if (::fstatat(directory, name, &st, AT_SYMLINK_NOFOLLOW) != 0 || !S_ISREG(st.st_mode) || !IsOwnerTrusted(st))
         return false;
-    // Earlier releases let everybody read the lock files. Nobody else can exchange them in this directory.
+    // Earlier releases let everybody read the lock files. Other users cannot exchange them in this directory.
     return (st.st_mode & 077) == 0 || st.st_uid != ::geteuid() || ::fchmodat(directory, name, kFileMode, 0) == 0;
 }
 

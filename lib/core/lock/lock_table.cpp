@@ -10,8 +10,8 @@ static_assert(sizeof(void *) != 4 || (sizeof(TLIBLOCKFILE) == 20 && offsetof(TLI
 
 extern "C" {
 
-// The order is the one in which a request takes its locks; two programs that ask for the same locks in several requests
-// ask in this order, too.
+// A request takes its locks in this order. Programs that ask for the same locks in several requests ask in this order,
+// too.
 // clang-format off
 constinit TLIBLOCKFILE rgslckList[21] = {
     {nullptr, "/tmp/lock/lock_tavoinfo",  TAVO_LOCK_TAVOINFO,    0, 0},

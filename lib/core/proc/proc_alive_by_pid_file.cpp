@@ -1,4 +1,4 @@
-// Tells whether the process that a pid file names is there.
+// Checks whether the process that a pid file names exists.
 #include "tavo_proc.h"
 
 extern "C" int TLIBProcAliveByPidFile(const char *szPath)

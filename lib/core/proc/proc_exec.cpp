@@ -1,4 +1,4 @@
-// Runs a program apart from the caller and waits for its end.
+// Runs a program detached from the caller and waits for its end.
 #include "tavo_proc.h"
 
 #include "core/detail/argument_list.h"

@@ -16,10 +16,10 @@ extern "C" int TAVOProcPidFileCreate(const char *szPath)
         struct stat st;
         if (!fd || ::fstat(fd.Get(), &st) != 0)
             return Fail(ERR_OPEN_FAILED);
-        // A pid file that others may write to is not believed.
+        // A pid file that others may write to is not trusted.
         if ((st.st_mode & tavo::kWritableByOthers) != 0)
             ::fchmod(fd.Get(), st.st_mode & tavo::kPermissions & ~tavo::kWritableByOthers);
-        // Written over the old text and cut afterwards: who reads meanwhile finds a whole first line, old or new.
+        // Overwrites the old text and cuts the file afterwards: a reader always finds a whole first line, old or new.
         const std::string text = std::to_string(::getpid()) + "\n";
         if (!tavo::WriteAll(fd.Get(), text) || ::ftruncate(fd.Get(), static_cast<off_t>(text.size())) != 0 ||
             !fd.Close())

@@ -1,4 +1,4 @@
-// Runs a program apart from the caller, for a limited time.
+// Runs a program detached from the caller, for a limited time.
 #include "tavo_proc.h"
 
 #include "core/detail/argument_list.h"
@@ -19,7 +19,7 @@ namespace {
 using std::chrono::seconds;
 using tavo::ChildBell;
 
-// How long a killed program may take to die. One that hangs in the kernel (a dead disk) is left to a later call.
+// How long a killed program may take to die. A later call collects one that hangs in the kernel (a dead disk).
 constexpr seconds kPatience{1};
 
 // The result of the child when it has ended.
@@ -47,7 +47,7 @@ std::optional<int> CollectBefore(ChildBell::Clock::time_point deadline, ChildBel
     }
 }
 
-// The child leads a process group, so what it has started goes with it.
+// The child leads a process group, so the programs that it has started die with it.
 void Kill(pid_t pid)
 {
     for (const int signal : {SIGTERM, SIGKILL}) {

@@ -43,7 +43,7 @@ class ScratchFile {
     bool IsTaken() const { return is_taken_; }
     const std::string &Path() const { return path_; }
 
-    // The file as it stands under its name now, if it still is the one that was created.
+    // Opens the file under its name, if the name still leads to the file that was created.
     tavo::File Reopen() const
     {
         tavo::Fd fd = tavo::OpenRegular(path_.c_str(), O_RDONLY | O_NOFOLLOW);
@@ -60,10 +60,10 @@ class ScratchFile {
   private:
     std::string path_;
     tavo::Fd fd_;
-    bool is_taken_ = false;  // the usual name belongs to somebody else
+    bool is_taken_ = false;  // another user's file has the usual name
 };
 
-// What is found, line by line.
+// The matches, line by line.
 class Search {
   public:
     Search(const std::string &pattern, pid_t *pids, int capacity)
@@ -71,7 +71,7 @@ class Search {
     {
     }
 
-    // A line without a pid (a title, a complaint of grep) is no process.
+    // A line without a pid (a title, a complaint of grep) is not a process.
     void Add(std::string_view line)
     {
         if (line.find(plain_) != std::string_view::npos || line.find(quoted_) != std::string_view::npos) {
@@ -88,7 +88,7 @@ class Search {
         ++count_;
     }
 
-    // The search is a process that matches, too: without a single line, nobody has listed processes.
+    // The search itself is a process that matches: no line at all means that no processes were listed.
     bool HasListed() const { return listed_; }
     int Count() const { return count_; }
 
@@ -111,10 +111,10 @@ void AddLines(std::FILE *stream, Search &search)
     const bool all = std::feof(stream) != 0;
     std::free(line);
     if (!all)
-        throw std::bad_alloc();  // half a list would say that some do not run
+        throw std::bad_alloc();  // an incomplete list would hide running processes
 }
 
-// Where ps cannot serve.
+// Used where ps fails.
 int FindInProcessTable(const std::string &pattern, Search &search)
 {
     for (const tavo::Process &process : tavo::ListProcesses()) {

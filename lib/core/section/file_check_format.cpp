@@ -8,7 +8,7 @@
 
 namespace {
 
-// Conversion by conversion: the end of a "%%" and an "s" behind it are no "%s".
+// Reads conversion by conversion: the end of a "%%" and an "s" after it are not a "%s".
 bool InOrder(std::string_view format)
 {
     constexpr std::string_view pieces[] = {"%s", "=", "%s", "\n"};

@@ -37,7 +37,7 @@ extern "C" int TLIBFileEnumSection(const char *szPath, TLIBSZLIST **ppslNames)
             if (!tavo::IsSectionHeader(header))
                 continue;
             if (line.size() > kLongestHeader)
-                return -1;  // without a code, as ever
+                return -1;  // without a code, for compatibility
             if (TLIBSzListPush(ppslNames, SectionName(header).c_str()) < 0)
                 return -1;  // the push has set its own
         }

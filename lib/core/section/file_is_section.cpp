@@ -1,4 +1,4 @@
-// Tells whether a line is a section header.
+// Checks whether a line is a section header.
 #include "tavo_section.h"
 
 #include "core/detail/fault.h"

@@ -1,4 +1,4 @@
-// Tells whether a line heads a section of a name.
+// Checks whether a line is the header of a given section.
 #include "tavo_section.h"
 
 #include "core/detail/fault.h"

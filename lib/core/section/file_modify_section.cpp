@@ -19,7 +19,7 @@ struct Change {
     const char *format;
 };
 
-// The changed text; empty when the new section cannot be written, which has been reported.
+// Returns the changed text; empty when the new section cannot be written, which has been reported.
 std::optional<std::string> Changed(std::string_view text, const Change &change, bool &found)
 {
     std::string changed;

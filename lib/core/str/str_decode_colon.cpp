@@ -9,7 +9,7 @@
 
 namespace {
 
-// The first byte of the text as it was before encoding; the text moves on.
+// Returns the first byte as it was before encoding, and advances the text.
 char NextDecoded(std::string_view &text)
 {
     const tavo::ColonCode *code = tavo::CodeAt(text);
@@ -33,7 +33,7 @@ extern "C" int TLIBStrDecodeColon(const char *szSrc, char *szDst, int cbDst)
     if (length > INT_MAX || (szDst && length > static_cast<size_t>(cbDst)))
         return Fail(ERR_NOT_ENOUGH_MEMORY);
     if (szDst) {
-        // Never longer than what it was read from, so in place nothing is overwritten before it is read.
+        // The result is never longer than the text read, so decoding in place overwrites nothing unread.
         for (std::string_view rest = text; !rest.empty(); ++szDst)
             *szDst = NextDecoded(rest);
         *szDst = '\0';

@@ -10,8 +10,8 @@
 
 namespace {
 
-// How the first byte of the text is written. A percent sign is only encoded where decoding would take it for one of
-// the sequences; most descriptions with a percent sign so stay readable in the file.
+// Returns the encoding of the first byte. A percent sign is only encoded where decoding would read one of the
+// sequences, so most descriptions with a percent sign stay readable in the file.
 std::string_view Encoded(std::string_view text)
 {
     if (text.front() != '%') {

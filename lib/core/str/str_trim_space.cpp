@@ -18,7 +18,7 @@ std::string_view Trimmed(std::string_view text)
         return text.substr(0, 0);
     text = text.substr(0, text.find_last_not_of(kWhiteSpace) + 1);
     text.remove_prefix(first);
-    // A quote alone is text.
+    // A lone '"' is text.
     if (text.size() > 1 && text.front() == '"' && text.back() == '"') {
         text.remove_prefix(1);
         text.remove_suffix(1);

@@ -27,7 +27,7 @@ std::string UpperAscii(std::string_view text)
     return upper;
 }
 
-// What `convert` makes of a text, in as many units as it takes; nothing when it makes nothing of it.
+// Returns the result of `convert` on a text, in as many units as it takes; nothing when it fails.
 template <class Text, class Convert>
 std::optional<Text> Converted(size_t likely, Convert convert)
 {
@@ -45,7 +45,7 @@ std::optional<Text> Converted(size_t likely, Convert convert)
     }
 }
 
-// Nothing when the text is not UTF-8, or the tables cannot be loaded.
+// Returns nothing when the text is not UTF-8, or the tables cannot be loaded.
 std::optional<std::string> Upper(std::string_view text)
 {
     if (IsAscii(text))

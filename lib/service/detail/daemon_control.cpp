@@ -50,7 +50,7 @@ bool ReloadFtp()
     return RunCommand("/usr/bin/killall -HUP ftpd > /dev/null 2>&1") == 0;
 }
 
-// The script's stop waits for open transfers; the dispatcher ends them. A server that does not run is stopped.
+// The script's stop waits for open transfers; the dispatcher ends them. Stopping a stopped server succeeds.
 bool StopFtp()
 {
     return TLIBExec("/usr/bin/killall", "ftpd", nullptr) == 0 || !IsProcessNamed("ftpd");
@@ -71,7 +71,7 @@ bool ReloadWebdav()
     return RunIfPidFileIsSound("/var/run/httpd-webdav.pid", "/bin/kill -1 `cat /var/run/httpd-webdav.pid`");
 }
 
-// The server is in the kernel: the export table is what can be read anew.
+// The server is in the kernel; only the export table can be read again.
 bool ReloadNfs()
 {
     return IsProcessNamed("[nfsd]") && TLIBExec("/usr/sbin/exportfs", "-ra", nullptr) == 0;

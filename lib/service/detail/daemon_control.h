@@ -6,8 +6,8 @@
 
 namespace tavo {
 
-// `daemon` is one bit of TAVO_DAEMON_*, `operation` one of TAVO_DAEMON_STOP to TAVO_DAEMON_RELOAD. True when the command
-// ran and succeeded; false too for a daemon that has no command for the operation.
+// `daemon` is one bit of TAVO_DAEMON_*, `operation` one of TAVO_DAEMON_STOP to TAVO_DAEMON_RELOAD. True when the
+// command ran and succeeded; false also for a daemon without a command for the operation.
 bool ControlDaemon(uint32_t daemon, int operation);
 
 // The database servers, which only the database stack drives.

@@ -1,4 +1,4 @@
-// Data folders of services: real folders, never links to one. Who may write to a volume must not choose where root puts
+// Data folders of services: real folders, never links. A user who may write to a volume must not choose where root puts
 // the data of services.
 #ifndef TAVO_SERVICE_DETAIL_DATA_FOLDER_H
 #define TAVO_SERVICE_DETAIL_DATA_FOLDER_H
@@ -12,7 +12,7 @@
 
 namespace tavo {
 
-// The record of a data folder for those who need its name: a link that cannot be read does not matter to them. False for a
+// Reads the record of a data folder for callers that need only its name, so an unreadable link is ignored. False for a
 // bad id, which has been recorded.
 inline bool FindDataFolder(int idShare, TAVOSERVICESHARE &share)
 {

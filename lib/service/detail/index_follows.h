@@ -6,7 +6,7 @@
 
 namespace tavo {
 
-// Restarts it after an action that started or stopped such a service. Its failure is not the service's.
+// Restarts the daemon after an action that started or stopped such a service. Its failure does not fail the service.
 inline void LetIndexFollow(int action)
 {
     if (action <= TAVO_SERVICE_RESTART)

@@ -9,7 +9,7 @@
 namespace tavo {
 namespace {
 
-// "/usr/sbin/ftpd" and "ftpd:" (a daemon that writes what it is doing behind its name) are "ftpd".
+// "/usr/sbin/ftpd" and "ftpd:" (a daemon that appends its activity to its name) are "ftpd".
 std::string_view PlainName(std::string_view word) noexcept
 {
     word.remove_prefix(word.rfind('/') + 1);

@@ -6,11 +6,11 @@
 
 namespace tavo {
 
-// True when a process of that name runs: a program of that name wherever it lies, a script of that name, or a kernel
+// True when a process of that name runs: a program of that name in any folder, a script of that name, or a kernel
 // thread, "[nfsd]" or "nfsd". Programs that merely mention the name among their arguments do not count.
 bool IsProcessNamed(std::string_view name);
 
-// The name in one line of the process table; exported here for the tests.
+// Returns the name in one line of the process table; declared here for the tests.
 bool CommandHasName(std::string_view command, std::string_view name);
 
 }  // namespace tavo

@@ -1,4 +1,4 @@
-// The two tables of the services: what there is, and where each keeps its data.
+// The two tables of the services: their rows, and where each keeps its data.
 #include "service/detail/service_table.h"
 
 #include <algorithm>

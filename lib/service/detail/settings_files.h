@@ -11,18 +11,18 @@
 
 namespace tavo {
 
-inline constexpr const char *kSettings = "/etc/tavoinfo.conf";                  // what is switched on
-inline constexpr const char *kFactorySettings = "/etc.defaults/tavoinfo.conf";  // what the model has
+inline constexpr const char *kSettings = "/etc/tavoinfo.conf";                  // the switches
+inline constexpr const char *kFactorySettings = "/etc.defaults/tavoinfo.conf";  // the model's capabilities
 
-// True when the key's value is `word`, in any case of letters; values are "yes" and "no", so eight bytes hold them.
+// True when the key's value is `word`, in any case of letters. Values are "yes" and "no", so eight bytes hold them.
 inline bool SettingIs(const char *file, const char *key, const char *word) noexcept
 {
     char value[8];
-    const KeepFault keep;  // a key that is not there is an answer
+    const KeepFault keep;  // a missing key is an answer
     return TLIBFileGetKeyValue(file, key, value, sizeof value, 0) > 0 && ::strcasecmp(value, word) == 0;
 }
 
-// Switched on by its key; a service without one is driven by others.
+// Whether the service's key switches it on. A service without a key is driven by others.
 inline bool IsSwitchedOn(const TAVOSERVICE &service) noexcept
 {
     return service.szKey && SettingIs(kSettings, service.szKey, "yes");

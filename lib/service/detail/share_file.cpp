@@ -1,4 +1,4 @@
-// The record of shared folders, /usr/tavo/etc/share.conf: one section a share, with its path.
+// The record of shared folders, /usr/tavo/etc/share.conf: one section per share, with its path.
 #include "service/detail/share_file.h"
 
 #include "tavo_file.h"
@@ -17,7 +17,7 @@ namespace tavo {
 namespace {
 
 constexpr const char *kShares = "/usr/tavo/etc/share.conf";
-constexpr unsigned kSharesLock = 0x40 | 6;  // that of Samba, whose configuration the shares become
+constexpr unsigned kSharesLock = 0x40 | 6;  // Samba's lock: its configuration is made from the shares
 constexpr int kLockSeconds = 5;
 constexpr int kHashBytes = 512;
 
@@ -57,7 +57,7 @@ int RecordShare(const char *name, const std::string &path)
         return code;
     if (TLIBSzHashSetValue(share.Addr(), "path", path.c_str()) < 0)
         return ERR_OUT_OF_MEMORY;
-    // A share that is not recorded yet is not a failure, so the code that says so must not reach the caller.
+    // A share that is not recorded yet is not a failure, so the caller must not see that code.
     const KeepFault keep;
     const int found = ErrTLIBFileSetSection(kShares, name, nullptr, share.Get(), 1, nullptr);
     if (found < 0 || (found == 0 && ErrTLIBFileAddSection(kShares, name, share.Get(), nullptr) < 0))

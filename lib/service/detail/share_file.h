@@ -1,4 +1,4 @@
-// The record of shared folders, /usr/tavo/etc/share.conf: one section a share, with its path.
+// The record of shared folders, /usr/tavo/etc/share.conf: one section per share, with its path.
 #ifndef TAVO_SERVICE_DETAIL_SHARE_FILE_H
 #define TAVO_SERVICE_DETAIL_SHARE_FILE_H
 
@@ -6,15 +6,15 @@
 
 namespace tavo {
 
-// Each gives 0 or the code of what failed. Changes are made under the lock of the shares.
+// Each function returns 0 or a code. Changes are made under the lock of the shares.
 
-// The share's path; empty when it is not recorded.
+// Returns the share's path; empty when it is not recorded.
 int SharePath(const char *name, std::string &path);
 
-// Sets the path of a share and keeps what else its section says; adds a share that is not there.
+// Sets the path of a share and keeps the other keys of its section; adds a missing share.
 int RecordShare(const char *name, const std::string &path);
 
-// A share that is not recorded is no failure.
+// Removing a share that is not recorded succeeds.
 int ForgetShare(const char *name);
 
 }  // namespace tavo

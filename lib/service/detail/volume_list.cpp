@@ -34,7 +34,7 @@ std::string ReadWhole(const char *path)
     return text;
 }
 
-// The kernel's own path of the disk names the bus that it hangs on.
+// The kernel's own path of the disk names the bus that the disk is connected to.
 bool IsBehindUsb(std::string_view device)
 {
     constexpr std::string_view dev = "/dev/";

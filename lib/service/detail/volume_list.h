@@ -18,13 +18,13 @@ struct Volume {
     bool writable = false;
 };
 
-// The volumes in the text of /proc/mounts, by number; of a path that is mounted over, the last mount counts.
+// Lists the volumes in the text of /proc/mounts, by number. If a path is mounted over, its last mount counts.
 std::vector<Volume> ParseVolumes(std::string_view mounts);
 
-// The number of "/volumeN"; 0 for anything else.
+// Returns the number of "/volumeN"; 0 for anything else.
 int VolumeNumber(std::string_view path) noexcept;
 
-// The "/volumeN" that a path lies on; empty when it lies elsewhere.
+// Returns the "/volumeN" that holds the path; empty when no volume does.
 std::string_view VolumeOf(std::string_view path) noexcept;
 
 std::vector<Volume> MountedVolumes();
@@ -32,7 +32,7 @@ std::vector<Volume> MountedVolumes();
 // Remote by its file system or source; external by a file system of removable disks, or a disk behind USB.
 VolumeKind KindOf(const Volume &volume);
 
-// The kind of the mounted volume that `path` lies on; -1 when there is none.
+// Returns the kind of the mounted volume that holds `path`; -1 when there is none.
 int VolumeType(std::string_view path);
 
 }  // namespace tavo
