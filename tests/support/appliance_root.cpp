@@ -1,4 +1,4 @@
-// What the environment says of the root.
+// Reads the environment's description of the root.
 #include "support/appliance_root.h"
 
 #include <cstdlib>

@@ -1,4 +1,4 @@
-// Takes the place of syslog in a test program: what the library logs is kept and can be compared.
+// Takes the place of syslog in a test program: the library's log lines are kept and can be compared.
 #ifndef TESTS_SUPPORT_CAPTURED_LOG_H
 #define TESTS_SUPPORT_CAPTURED_LOG_H
 
@@ -14,7 +14,7 @@ struct LoggedLine {
     bool operator==(const LoggedLine &) const = default;
 };
 
-// From its construction on the lines are its own; one at a time.
+// Lines are kept from its construction on; one object at a time.
 class CapturedLog {
   public:
     CapturedLog();

@@ -1,4 +1,4 @@
-// Outputs of the real tools and kernel files, byte for byte; captures/ has one a file, named by what gave it.
+// Outputs of the real tools and kernel files, byte for byte; captures/ has one file each, named by its origin.
 #ifndef TESTS_SUPPORT_CAPTURES_H
 #define TESTS_SUPPORT_CAPTURES_H
 
@@ -11,7 +11,7 @@ struct CaptureRow {
     std::string_view text;
 };
 
-// Compiled in: tests run where the source tree is not.
+// Compiled in: tests run where the source tree is not visible.
 extern const CaptureRow kCaptures[];
 extern const int kCaptureCount;
 

@@ -1,4 +1,4 @@
-// How many descriptors are open: what a call leaves behind shows here.
+// Counts the open descriptors: a descriptor that a call leaves open shows here.
 #ifndef TESTS_SUPPORT_DESCRIPTORS_H
 #define TESTS_SUPPORT_DESCRIPTORS_H
 

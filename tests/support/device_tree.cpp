@@ -1,5 +1,5 @@
 // Takes the place of the kernel's view of the disks.
-#undef _FORTIFY_SOURCE  // its inline versions of these functions cannot be taken the place of
+#undef _FORTIFY_SOURCE  // its inline versions of these functions cannot be interposed
 
 #include "support/device_tree.h"
 
@@ -141,7 +141,7 @@ bool DeviceTree::IsDisk(ino_t inode, dev_t &number) const
 using test::current;
 using test::Real;
 
-// Weak, because a test program may stand in for one of them itself.
+// Weak, because a test program may define one of them itself.
 extern "C" {
 
 [[gnu::weak]] int open(const char *path, int flags, ...)

@@ -1,6 +1,6 @@
-// Takes the place of the kernel's view of the disks: while one of these stands, this process finds /dev/sd*, /dev/md*,
-// /dev/ttyS1, /sys, /proc/partitions, /proc/mounts and the model's settings in a directory of the test's own. Programs that it
-// starts do not.
+// Takes the place of the kernel's view of the disks: while a DeviceTree exists, this process finds /dev/sd*, /dev/md*,
+// /dev/ttyS1, /sys, /proc/partitions, /proc/mounts and the model's settings in a directory of the test's own. Programs
+// that it starts do not.
 #ifndef TESTS_SUPPORT_DEVICE_TREE_H
 #define TESTS_SUPPORT_DEVICE_TREE_H
 
@@ -29,10 +29,10 @@ class DeviceTree {
 
     // A device node: fstat tells a block device of that number.
     void AddDisk(const std::string &path, unsigned major, unsigned minor, std::string_view content = "");
-    // A node whose device is not there: opening it gives ENXIO.
+    // A node whose device is missing: opening it fails with ENXIO.
     void AddAbsent(const std::string &path);
 
-    // The kernel uses the device of this path: opening it exclusively gives EBUSY.
+    // The kernel uses the device of this path: opening it exclusively fails with EBUSY.
     void AddBusy(const std::string &path) { Put(path + kBusy, ""), Put(path, ""); }
     static constexpr const char *kBusy = ".busy";
 

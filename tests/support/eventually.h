@@ -1,4 +1,4 @@
-// Waits for what must come, however loaded the machine is.
+// Waits for a condition, however loaded the machine is.
 #ifndef TESTS_SUPPORT_EVENTUALLY_H
 #define TESTS_SUPPORT_EVENTUALLY_H
 
@@ -8,7 +8,7 @@
 
 namespace test {
 
-// Asks until the condition holds, for two minutes at most; whether it held.
+// Asks until the condition holds, for two minutes at most; returns whether it held.
 template <class Condition>
 bool Eventually(Condition condition)
 {

@@ -84,7 +84,7 @@ void EachAllocation::Disarm()
     armed.on = false;
     fired_ = armed.fired;
 #ifdef TEST_WITH_ASAN
-    left_allocated_ = 0;  // the sanitizer allocates beside us, and has its own look for leaks at the end
+    left_allocated_ = 0;  // the sanitizer allocates, too, and checks for leaks itself at the end
 #else
     left_allocated_ = armed.live;
 #endif
@@ -165,7 +165,7 @@ void free(void *block)
 }
 
 #ifdef TEST_WITH_ASAN
-// The sanitizer has operators of its own, which do not come to malloc; the library's and the test's must.
+// The sanitizer has operators of its own, which do not call malloc; the library's and the test's must.
 void *operator new(size_t size)
 {
     void *block = malloc(size ? size : 1);

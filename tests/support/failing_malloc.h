@@ -1,5 +1,5 @@
 // Lets one memory allocation fail, and counts what a call leaves allocated. Takes the place of malloc, calloc, realloc
-// and free in the test program, for the library too; under the address sanitizer it stands before the sanitizer's own.
+// and free in the test program, for the library too; under the address sanitizer it runs before the sanitizer's own.
 //
 //     test::EachAllocation faults;
 //     while (faults.Next()) {
@@ -18,8 +18,9 @@
 
 namespace test {
 
-// The first allocation fails in the first round, the second in the second, ... until a round needs fewer. A round that
-// prepares anew sees each failure from the same state. One at a time; only the thread that arms it is concerned.
+// The first allocation fails in the first round, the second in the second, ... until a round needs fewer. Each round
+// prepares again, so that every failure starts from the same state. One object at a time; only the thread that arms it
+// is affected.
 class EachAllocation {
   public:
     EachAllocation() = default;
@@ -41,13 +42,13 @@ class EachAllocation {
     int left_allocated_ = 0;
 };
 
-// The same by hand, for a call in a process of its own. Counting begins with StartCounting; from FailAllocation on the
+// The same by hand, for a call in a process of its own. Counting begins with StartCounting; after FailAllocation the
 // Nth allocation fails, until StopFailing.
 void StartCounting();
 void FailAllocation(int n);
 void StopFailing();
 bool AllocationFailed();
-bool FailedInside(const char *object);  // whether a library of that name was on the stack of the one that failed
+bool FailedInside(const char *object);  // whether a library of that name was on the stack of the failed allocation
 int StopCounting();                     // blocks allocated since StartCounting less blocks freed
 
 }  // namespace test

@@ -34,7 +34,7 @@ inline std::ostream &operator<<(std::ostream &out, const Fault &fault)
     return out << std::hex << std::showbase << fault.code << std::dec << " from " << fault.module << ":" << fault.line;
 }
 
-// Clears the state, so that a test sees what the next call sets, and that it sets nothing.
+// Clears the state, so that a test sees exactly what the next call sets.
 inline void ForgetFault()
 {
     TLIBErrSet(ERR_SUCCESS);

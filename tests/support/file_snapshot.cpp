@@ -1,4 +1,4 @@
-// What is in some folders, as a value that can be compared and put back.
+// The contents of some folders, as a value that can be compared and restored.
 #include "support/file_snapshot.h"
 
 #include "support/scratch_dir.h"
@@ -36,7 +36,7 @@ std::string ContentOf(const std::string &path, const struct stat &facts)
     return {};
 }
 
-// What is mounted in a folder is another's: in a tree that was cloned into /tmp, the build with this program.
+// Mounted file systems are left out: in a tree that was cloned into /tmp, they hold the build with this program.
 void AddFolder(const std::string &folder, dev_t device, const KeptFiles &known, KeptFiles &files)
 {
     std::error_code none;
@@ -100,7 +100,7 @@ void FileSnapshot::Restore()
 {
     std::error_code none;
     const KeptFiles now = Now();
-    for (auto file = now.rbegin(); file != now.rend(); ++file) {  // what is in a folder before the folder
+    for (auto file = now.rbegin(); file != now.rend(); ++file) {  // a folder's contents before the folder
         if (!files_.contains(file->first))
             std::filesystem::remove(file->first, none);
     }

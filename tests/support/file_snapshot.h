@@ -1,4 +1,4 @@
-// What is in some folders, as a value that can be compared and put back.
+// The contents of some folders, as a value that can be compared and restored.
 #ifndef TESTS_SUPPORT_FILE_SNAPSHOT_H
 #define TESTS_SUPPORT_FILE_SNAPSHOT_H
 
@@ -28,10 +28,10 @@ class FileSnapshot {
 
     const KeptFiles &Files() const { return files_; }
 
-    // What is there now; the content of files that have not been touched since is taken from here.
+    // Reads the current state; contents of files that have not been touched since are taken from here.
     KeptFiles Now() const;
 
-    // Puts back what has changed, owner, mode and time of change included, and removes what is new.
+    // Restores changed files, including owner, mode and modification time, and removes new ones.
     void Restore();
 
   private:

@@ -1,4 +1,4 @@
-// Names that somebody may pass to have more happen than he is allowed to.
+// Names that a caller may pass to make more happen than the caller is allowed to.
 #ifndef TESTS_SUPPORT_HOSTILE_NAMES_H
 #define TESTS_SUPPORT_HOSTILE_NAMES_H
 
@@ -7,7 +7,7 @@
 
 namespace test {
 
-// The file that each of them would create, were it taken for a part of a command.
+// The file that each of them would create if it were executed as part of a command.
 inline const char *const kCanary = "/tmp/canary";
 
 // 200 and more; none is the name of a device, with or without "/dev/" before it.

@@ -1,4 +1,4 @@
-// The virtual appliance as tests see it.
+// The virtual appliance for tests.
 #include "support/machine.h"
 
 #include "support/appliance_root.h"
@@ -13,7 +13,7 @@ namespace test {
 
 bool OnMachine()
 {
-    // A desk may have disks, too: these are told by the name of the root, not by theirs.
+    // A developer's machine may have disks, too: these are recognised by the name of the root.
     struct stat facts;
     return RootForm() == "machine" && ::stat("/dev/sda", &facts) == 0 && S_ISBLK(facts.st_mode);
 }

@@ -1,4 +1,4 @@
-// The virtual appliance as tests see it. Suites whose names begin with "Machine" run there with the real tools, on the
+// The virtual appliance for tests. Suites whose names begin with "Machine" run there with the real tools, on the
 // machine's own disks and cards; elsewhere they are skipped.
 #ifndef TESTS_SUPPORT_MACHINE_H
 #define TESTS_SUPPORT_MACHINE_H
@@ -26,16 +26,16 @@ struct CommandResult {
     std::string output;
 };
 
-// Runs a line of shell, standard error among the output.
+// Runs a line of shell with its standard error joined to its output.
 CommandResult Shell(const std::string &line);
 
-// The output of a line of shell that must succeed.
+// Returns the output of a line of shell that must succeed.
 std::string Told(const std::string &line);
 
-// Something that happens from outside and has happened then, see appliance-event: "pull 2", "plug 2 --blank", "cut eth0".
+// Makes an event happen from outside and returns after it, see appliance-event: "pull 2", "plug 2 --blank", "cut eth0".
 void Happen(const std::string &event);
 
-// Waits, generously, for what must come.
+// Waits, generously, for a condition.
 bool Comes(const std::function<bool()> &condition);
 
 }  // namespace test

@@ -15,7 +15,7 @@
 
 namespace test {
 
-// Ended and collected when it goes.
+// Killed and collected by the destructor.
 class OwnChild {
   public:
     template <class Body>
@@ -49,7 +49,7 @@ class OwnChild {
     pid_t pid_;
 };
 
-// Runs `body` in a process of its own; its result.
+// Runs `body` in a process of its own and returns its result.
 template <class Body>
 int InChild(Body body)
 {
@@ -58,7 +58,7 @@ int InChild(Body body)
     return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
 }
 
-// A process of another user, which waits to be signalled.
+// A process of another user, which waits for a signal.
 inline void BecomeAndWait(uid_t uid)
 {
     if (::setresuid(uid, uid, uid) != 0)

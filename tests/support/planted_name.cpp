@@ -1,4 +1,4 @@
-// What somebody without rights may put at a name under /tmp before the appliance uses it.
+// Files that an unprivileged user may plant at a name under /tmp before the appliance uses it.
 #include "support/planted_name.h"
 
 #include "support/scratch_dir.h"
@@ -85,7 +85,7 @@ std::string MovedAside(const std::string &path)
 
 void RemovePlanted(const std::string &path)
 {
-    // From the top: each folder's own folder takes its place.
+    // From the top: each folder is replaced by its own subfolder.
     const std::string at = path + "/d", below = at + "/d", aside = path + "/aside";
     while (::rename(below.c_str(), aside.c_str()) == 0 && ::rmdir(at.c_str()) == 0 &&
            ::rename(aside.c_str(), at.c_str()) == 0) {

@@ -31,7 +31,7 @@ Function *Real(const char *name)
 
 RecordedCalls::RecordedCalls(Request on_ioctl) : on_ioctl_(std::move(on_ioctl))
 {
-    calls_.reserve(1024);  // noting one allocates nothing: a test may count or refuse what the library allocates
+    calls_.reserve(1024);  // recording allocates nothing: a test may count or refuse the library's allocations
     current = this;
 }
 

@@ -11,7 +11,7 @@ namespace test {
 
 class RecordedCalls {
   public:
-    // What ioctl does: gives its result, sets errno, fills in the argument.
+    // The test's ioctl: returns its result, sets errno, fills in the argument.
     using Request = std::function<int(int fd, unsigned long request, void *argument)>;
 
     explicit RecordedCalls(Request on_ioctl = {});

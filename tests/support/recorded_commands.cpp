@@ -66,8 +66,8 @@ void RecordedCommands::Run(const char *command)
         std::memcpy(log_->text + log_->used, command, length);
         log_->used += length;
     }
-    // The child may share the parent's memory: what it allocates is freed before it goes, and it goes without the look
-    // for leaks that a sanitizer puts into _exit.
+    // The child may share the parent's memory: it frees what it allocates before it ends, and it skips the leak check
+    // that a sanitizer puts into _exit.
     ::syscall(SYS_exit_group, Reply(command));
     __builtin_unreachable();
 }

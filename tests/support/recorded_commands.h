@@ -1,5 +1,5 @@
-// Takes the place of the shell: the commands that the library composes are kept byte for byte, redirections included, and
-// answered by the test. No program runs.
+// Takes the place of the shell: the library's commands are kept byte for byte, including redirections, and answered by
+// the test. No program runs.
 #ifndef TESTS_SUPPORT_RECORDED_COMMANDS_H
 #define TESTS_SUPPORT_RECORDED_COMMANDS_H
 
@@ -11,12 +11,12 @@ namespace test {
 
 struct CommandReply {
     int status = 0;
-    std::string output = {};  // at most what a pipe holds, 64 KiB
+    std::string output = {};  // at most the size of a pipe, 64 KiB
 };
 
 class RecordedCommands {
   public:
-    // The answer may depend on the command alone: it is given in the child process, whose memory may be its own.
+    // The answer may depend on the command alone: the child process computes it, and its memory may not be the test's.
     using Answer = std::function<CommandReply(const std::string &command)>;
 
     explicit RecordedCommands(Answer answer = {});

@@ -1,4 +1,4 @@
-// How often tests with random moments or damage go round.
+// The number of rounds of tests with random moments or damage.
 #ifndef TESTS_SUPPORT_ROUNDS_H
 #define TESTS_SUPPORT_ROUNDS_H
 
@@ -8,8 +8,8 @@
 
 namespace test {
 
-// The virtual appliance, whose processor is emulated, has time for a part only; so has a build with sanitizers, which finds
-// in a few rounds what it is there to find.
+// The virtual appliance, whose processor is emulated, has time for a part only. So has a build with sanitizers, which
+// needs only a few rounds for its finds.
 inline bool TakesLong()
 {
 #ifdef __SANITIZE_ADDRESS__
@@ -19,7 +19,8 @@ inline bool TakesLong()
 #endif
 }
 
-// All of them when TAVO_LONG_TESTS is in the environment; else an eighth, so that a run of everything stays short.
+// Returns all of them when TAVO_LONG_TESTS is in the environment, otherwise an eighth, so that a full test run stays
+// short.
 inline int Rounds(int all)
 {
     if (std::getenv("TAVO_LONG_TESTS"))
@@ -27,7 +28,7 @@ inline int Rounds(int all)
     return all / (TakesLong() ? 32 : 8);
 }
 
-// From one of many moments to the next that is tried, such as the system calls at which something dies.
+// The step from one of many moments to the next one tried, such as the system calls at which a process dies.
 inline int Stride()
 {
     return TakesLong() && !std::getenv("TAVO_LONG_TESTS") ? 11 : 1;

@@ -1,4 +1,4 @@
-// Runs a program and reads both its outputs as they come.
+// Runs a program and reads both its outputs as they arrive.
 #include "support/running_program.h"
 
 #include <gtest/gtest.h>

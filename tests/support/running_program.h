@@ -1,4 +1,4 @@
-// A program that a test runs, and what it said.
+// A program that a test runs, and its outputs.
 #ifndef TESTS_SUPPORT_RUNNING_PROGRAM_H
 #define TESTS_SUPPORT_RUNNING_PROGRAM_H
 
@@ -13,7 +13,7 @@ namespace test {
 using Words = std::vector<std::string>;
 
 struct Ran {
-    int status;  // 128 and the signal for a death by one
+    int status;  // 128 plus the signal after a death by signal
     std::string out;
     std::string err;
 };
@@ -28,7 +28,7 @@ int ShellStatus(int wait_status);
 // Still running. Its outputs are pipes.
 class RunningProgram {
   public:
-    // It reads the input, which must fit into a pipe, as its standard input.
+    // Passes the input, which must fit into a pipe, to its standard input.
     RunningProgram(const std::string &path, const Words &words, const std::string &input = {});
     ~RunningProgram();  // kills it
     RunningProgram(const RunningProgram &) = delete;

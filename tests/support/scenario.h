@@ -1,5 +1,5 @@
-// Scripts the tools that the library runs: what is expected, what they print, how they end. At its end every expected
-// call was made and no other, or the test fails.
+// Scripts the tools that the library runs: which calls are expected, what they print, how they end. At its end every
+// expected call was made and no other, or the test fails.
 #ifndef TESTS_SUPPORT_SCENARIO_H
 #define TESTS_SUPPORT_SCENARIO_H
 
@@ -29,19 +29,19 @@ class ScriptedCall {
 class Scenario {
   public:
     Scenario();   // empty: any call of a scripted tool fails the test
-    ~Scenario();  // fails the test when something was not called, or not expected
+    ~Scenario();  // fails the test when an expected call is missing or another one came
     Scenario(const Scenario &) = delete;
     Scenario &operator=(const Scenario &) = delete;
 
-    // The whole argument vector, the tool as the library names it first ("/sbin/mdadm", "pvs").
+    // The whole argument vector, beginning with the tool as the library names it ("/sbin/mdadm", "pvs").
     ScriptedCall Expect(const std::vector<std::string> &words);
     ScriptedCall ExpectAny(const std::string &tool);  // with any arguments
     void InAnyOrder();
 
     // The calls so far, one quoted line each ("/sbin/mdadm -E /dev/sda3"), expected or not.
     static std::vector<std::string> Calls();
-    // What went otherwise than scripted; empty when nothing did. Asking starts anew, so the end does not complain
-    // again.
+    // Returns the differences from the script; empty when there are none. Resets them, so that the destructor does not
+    // report them again.
     std::string Finish();
 };
 

@@ -18,7 +18,7 @@ class ScratchDir {
     const std::string &Path() const { return path_; }
     std::string operator/(std::string_view name) const { return path_ + "/" + std::string(name); }
 
-    // The names in it, sorted: what a failed rewrite left behind shows here.
+    // Returns the names in it, sorted: leftovers of a failed rewrite show here.
     std::vector<std::string> Names() const;
 
   private:

@@ -1,4 +1,4 @@
-// What earlier calls leave on the stack: a function that reads a variable before it has set it finds this.
+// Fills the stack with known data: a function that reads a variable before it has set it finds this.
 #ifndef TESTS_SUPPORT_STALE_STACK_H
 #define TESTS_SUPPORT_STALE_STACK_H
 
@@ -8,7 +8,7 @@
 
 namespace test {
 
-// Leaves the word everywhere below the caller's frame.
+// Fills the stack below the caller's frame with the word.
 [[gnu::noinline]] inline void FillStack(uint32_t word)
 {
     uint32_t words[16384];

@@ -1,4 +1,4 @@
-// A string hash as a test fills and compares it.
+// A string hash that a test fills and compares.
 #ifndef TESTS_SUPPORT_STRING_HASH_H
 #define TESTS_SUPPORT_STRING_HASH_H
 
@@ -39,7 +39,7 @@ class StringHash {
         return pairs;
     }
 
-    // As a settings file holds it: in slot order.
+    // In the format of a settings file, in slot order.
     std::string Text() const
     {
         std::string text;

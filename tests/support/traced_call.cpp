@@ -94,8 +94,8 @@ class TimeLimit {
     struct sigaction before_;
 };
 
-// How this processor's registers say which system call is made, and what it gave. A number of -1 is none: the kernel makes
-// no call, and the result is what the registers hold then.
+// How this processor's registers describe a system call and its result. Number -1 means none: the kernel makes no call,
+// and the result is whatever the registers hold then.
 #if defined(__x86_64__) || defined(__arm__)
 
 constexpr bool kKnowsRegisters = true;
@@ -162,7 +162,7 @@ pid_t StartStopped(const std::function<void()> &work)
         ::_exit(120);
     ::kill(::getpid(), SIGSTOP);
     work();
-    // Not _exit: a sanitizer looks for leaks there, which it cannot do in a traced process.
+    // Not _exit: a sanitizer checks for leaks there, which it cannot do in a traced process.
     ::syscall(SYS_exit_group, 0);
     __builtin_unreachable();
 }
@@ -177,7 +177,8 @@ std::vector<uintptr_t> StackOf(pid_t child, uintptr_t top)
     return words;
 }
 
-// Runs the work and asks at each system call what becomes of it; once something has become of one, the rest goes on unseen.
+// Runs the work and lets `decide` choose at each system call. After the first one that was failed or killed, the rest
+// runs untraced.
 Ending RunTraced(const std::function<void()> &work, int seconds,
                  const std::function<Verdict(const SystemCall &)> &judge)
 {
@@ -221,7 +222,7 @@ Ending RunTraced(const std::function<void()> &work, int seconds,
         } else if (verdict.what == Verdict::fail) {
             ending.reached = true;
             ending.stack = StackOf(child, static_cast<uintptr_t>(info.stack_pointer));
-            // A close that fails has closed all the same.
+            // A close that fails has closed the descriptor.
             if (call.number == SYS_close || SkipCall(child))
                 failing = verdict.error;
         }
@@ -232,7 +233,7 @@ Ending RunTraced(const std::function<void()> &work, int seconds,
 
 constexpr int kMark = SYS_getsid;  // nothing else asks for this
 
-constexpr int kLongest = 60;  // seconds of what is not supposed to fail
+constexpr int kLongest = 60;  // seconds for what is not supposed to fail
 
 }  // namespace
 
@@ -268,7 +269,7 @@ std::ostream &operator<<(std::ostream &out, const Ending &ending)
 bool CanFail(const SystemCall &call)
 {
     switch (call.number) {
-    case SYS_brk:  // gives the end of the heap, whatever was asked for
+    case SYS_brk:  // returns the end of the heap, whatever was asked for
     case SYS_exit_group:
     case SYS_rt_sigreturn:
     case SYS_getpid:
@@ -297,7 +298,7 @@ bool CanFail(const SystemCall &call)
     case SYS_mprotect:
     case SYS_madvise:
 #endif
-    case SYS_rt_sigaction:  // of valid arguments, which the C library passes
+    case SYS_rt_sigaction:  // with valid arguments, which the C library passes
     case SYS_rt_sigprocmask:
         return false;
     default:

@@ -1,5 +1,5 @@
-// Runs a piece of work in a child process under ptrace, and ends it or fails one of its system calls there: also those that
-// the C library makes itself, which no interposed function sees.
+// Runs a piece of work in a child process under ptrace, and kills it or fails one of its system calls there. This
+// includes the calls of the C library itself, which no interposed function sees.
 //
 //     const std::function<void()> work = [] { TheCall(); };
 //     for (int n = 1; test::DiesAtCall(n, work); ++n)
@@ -18,7 +18,7 @@
 
 namespace test {
 
-// Whether this process may trace a child. Containers often refuse it, and so do emulators of single programs: tests skip
+// Whether this process may trace a child. Containers and emulators of single programs often refuse it: tests skip
 // themselves by name there.
 bool CanTrace();
 
@@ -33,32 +33,32 @@ struct SystemCall {
 // How the child ended.
 struct Ending {
     bool reached = false;               // the child made that many system calls
-    bool hung = false;                  // it did not end within the time limit, and was killed
+    bool hung = false;                  // it exceeded the time limit and was killed
     int status = 0;                     // as waitpid gives it
-    std::vector<uintptr_t> stack = {};  // words of it when the call was failed: who made it
+    std::vector<uintptr_t> stack = {};  // words of it when the call was failed: its caller
 
     bool IsClean() const { return !hung && status == 0; }
 };
 
 std::ostream &operator<<(std::ostream &out, const Ending &ending);
 
-// The system calls of the work in their order; the last one, which ends the child, is left out, and so is everything
-// outside of MarkCalls when the work has such marks. Programs that the child starts are not traced.
+// Returns the system calls of the work in their order, without the last one, which ends the child. If the work calls
+// MarkCalls, only the calls between the marks count. Programs that the child starts are not traced.
 std::vector<SystemCall> SystemCallsOf(const std::function<void()> &work);
 
-// Called before and after the part of the work whose system calls are meant.
+// Called before and after the part of the work whose system calls count.
 void MarkCalls();
 
 // The first one from each site, without those that cannot fail (getpid) or whose failure is not an errno (brk).
 std::vector<SystemCall> DistinctCalls(const std::vector<SystemCall> &calls);
 bool CanFail(const SystemCall &call);
 
-// This system call of the work is not made and gives -1 with `error`; only close is made, as a kernel does that reports an
-// error of what was written before. Everything after it is as usual. A signal may come elsewhere than it did when the calls
-// were counted: it is then the next call of that kind.
+// Fails this system call of the work with `error` instead of making it. Only close is made, as in a kernel that reports
+// an error of an earlier write. Everything after it is as usual. A signal may arrive elsewhere than it did when the
+// calls were counted: then the next call of that kind fails.
 Ending FailsAtCall(const SystemCall &which, int error, const std::function<void()> &work, int seconds = 20);
 
-// The child is killed before it makes its Nth system call. False when it came to its end before that.
+// Kills the child before it makes its Nth system call. False when it ended before that.
 bool DiesAtCall(int n, const std::function<void()> &work);
 
 }  // namespace test

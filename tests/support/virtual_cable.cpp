@@ -39,7 +39,7 @@ bool MountAnew(const char *type, const char *where, unsigned long flags = 0)
 
 bool Settle(const std::string &host_name)
 {
-    // A file system of the machine may be seen anew only as it was seen before.
+    // A file system of the machine may only be mounted again with the same flags.
     constexpr unsigned long flags = MS_NOSUID | MS_NODEV | MS_NOEXEC;
     if (::mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0 || !MountAnew("proc", "/proc", flags) ||
         !MountAnew("sysfs", "/sys", flags | MS_RDONLY) || !MountAnew("tmpfs", "/tmp") ||
@@ -48,12 +48,12 @@ bool Settle(const std::string &host_name)
     ::chmod("/tmp", 01777);
     for (const char *folder : {"/tmp/lock", "/tmp/etc"})
         std::filesystem::create_directory(folder);
-    // Settings of its own, too.
+    // Its own settings, too.
     return ShellStatus("cp -a /etc/. /tmp/etc/") == 0 && ::mount("/tmp/etc", "/etc", nullptr, MS_BIND, nullptr) == 0 &&
            ShellStatus("ip link set lo up") == 0;
 }
 
-// Process 1 of a node: collects who has lost his parent.
+// Process 1 of a node: collects orphaned processes.
 [[noreturn]] void BecomeInit(const std::string &host_name, int ready)
 {
     ::prctl(PR_SET_PDEATHSIG, SIGKILL);
@@ -100,7 +100,7 @@ Node::Node(const std::string &host_name)
     if (keeper_ == 0)
         BecomeKeeper(host_name, ready[1]);
     ::close(ready[1]);
-    // Its process id and the news that it has settled, in whatever order.
+    // Its process id and the report that it is ready, in either order.
     for (int i = 0; i < 2; ++i) {
         pid_t said = 0;
         EXPECT_EQ(::read(ready[0], &said, sizeof said), static_cast<ssize_t>(sizeof said)) << "no namespaces";
@@ -111,7 +111,7 @@ Node::Node(const std::string &host_name)
 
 Node::~Node()
 {
-    ::kill(pid_, SIGKILL);  // and with it everybody there
+    ::kill(pid_, SIGKILL);  // and with it every process there
     ::waitpid(keeper_, nullptr, 0);
 }
 
@@ -128,11 +128,11 @@ void Node::Enter() const
             ::_exit(125);
         ::close(fd);
     }
-    // Its mounts begin at the machine's root directory, and its own may be another.
+    // Its mounts begin at the machine's root directory, and its own root may be another.
     if (::fchdir(root) != 0 || ::chroot(".") != 0)
         ::_exit(125);
     ::close(root);
-    // In its process namespace are only the children.
+    // Only the children are in its process namespace.
     const pid_t pid = ::fork();
     if (pid != 0)
         ::_exit(StatusOf(pid));

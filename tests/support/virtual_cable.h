@@ -1,5 +1,6 @@
 // Appliances on one virtual cable: each has a network, processes, a host name, an /etc, a /tmp and a /var/run of its
-// own, in namespaces that end with the test. The cards are veth pairs, and the cable is a bridge in the test's own network namespace.
+// own, in namespaces that end with the test. The cards are veth pairs, and the cable is a bridge in the test's own
+// network namespace.
 #ifndef TESTS_SUPPORT_VIRTUAL_CABLE_H
 #define TESTS_SUPPORT_VIRTUAL_CABLE_H
 
@@ -20,11 +21,11 @@ class Node {
     Node(const Node &) = delete;
     Node &operator=(const Node &) = delete;
 
-    // Runs the function there, in a process of its own; false when it fails an assertion, dies or gives false.
+    // Runs the function there, in a process of its own; false when it fails an assertion, dies or returns false.
     bool Run(const std::function<bool()> &body) const;
-    // A command of the shell; its exit status.
+    // Runs a command of the shell and returns its exit status.
     int Shell(const std::string &command) const;
-    // What it printed.
+    // Returns its output.
     std::string Output(const std::string &command) const;
 
     pid_t Pid() const { return pid_; }
@@ -46,7 +47,7 @@ class VirtualCable {
     // A new card of the node, down and without an address, plugged into this cable.
     void Plug(const Node &node, const std::string &card);
 
-    // Why this root has no such thing; empty when it has.
+    // Why this root cannot have one; empty when it can.
     static std::string Missing();
 
   private:
@@ -54,7 +55,7 @@ class VirtualCable {
     std::vector<std::string> ends_;
 };
 
-// Runs a command of the shell here; its exit status.
+// Runs a command of the shell here and returns its exit status.
 int ShellStatus(const std::string &command);
 
 }  // namespace test

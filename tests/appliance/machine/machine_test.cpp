@@ -15,7 +15,7 @@ using MachineFacts = test::MachineTest;
 using MachineTools = test::MachineTest;
 using MachineEvents = test::MachineTest;
 
-TEST_F(MachineFacts, IsTheProcessorThatTheLibraryIsFor)
+TEST_F(MachineFacts, HasTheLibrarysProcessor)
 {
     utsname name;
     ASSERT_EQ(::uname(&name), 0);
@@ -25,7 +25,7 @@ TEST_F(MachineFacts, IsTheProcessorThatTheLibraryIsFor)
     EXPECT_THAT(Told("tavoctl version --json"), HasSubstr("armv7l"));
 }
 
-TEST_F(MachineFacts, DisksStandInTheOrderOfTheirBays)
+TEST_F(MachineFacts, DisksAreInTheOrderOfTheirBays)
 {
     for (int bay = 1; bay <= 6; ++bay) {
         const std::string disk = std::string("sd") + "abcdef"[bay - 1];
@@ -35,7 +35,7 @@ TEST_F(MachineFacts, DisksStandInTheOrderOfTheirBays)
     }
 }
 
-// What a family finds missing in its own tests is harder to understand there.
+// In a family's own tests a missing tool would be harder to understand.
 TEST_F(MachineTools, EachDoesItsWork)
 {
     static constexpr const char *lines[] = {

@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# A root is built once for the same inputs, anew when one of them changes, and holds what it was given.
+# A root is built once for the same inputs and again when one of them changes, and contains what was added to it.
 . "$(dirname "$0")/common.sh"
 
 printf 'int main(int c, char **v) { return c == 2 && v[1][0] == 0x78 ? 21 : 1; }\n' >"$scratch/main.c"
@@ -25,7 +25,7 @@ same 'a changed program' 22 $?
 
 # Under chroot alone the programs are shared with the tree: editing one is noticed, and the next build repairs it.
 if [[ $(id -u) -eq 0 ]]; then
-    "$tools/enter" --root "$new" --form chroot -- /bin/sh -c 'echo x >>/usr/tavo/bin/probe' || complain 'a copied file is no matter'
+    "$tools/enter" --root "$new" --form chroot -- /bin/sh -c 'echo x >>/usr/tavo/bin/probe' || complain 'editing a copied file does no harm'
     for edited in /usr/bin/killall /usr/bin/bash; do
         message=$("$tools/enter" --root "$new" --form chroot -- /bin/sh -c "echo x >>$edited" 2>&1)
         same "edited $edited" 125 $?

@@ -33,7 +33,7 @@ for form in $forms; do
         "$($enter --form "$form" --bind "$PWD" -- pwd)"; exit $failed) || failed=1
 done
 
-# The same for somebody who is nobody. A tree that he cannot reach cannot be tried.
+# The same for an unprivileged user, if that user can reach the tree.
 if [[ $(id -u) -eq 0 ]]; then
     as_nobody="setpriv --reuid nobody --regid nogroup --clear-groups"
     $as_nobody test -r "$root/manifest" || skip "nobody cannot read $root"

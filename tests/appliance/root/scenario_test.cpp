@@ -45,7 +45,7 @@ Result RunTool(const std::vector<std::string> &words)
     return result;
 }
 
-TEST(Scenario, PlaysWhatWasScriptedWhateverTheArgumentsHold)
+TEST(Scenario, PlaysTheScriptForAnyArguments)
 {
     const std::vector<std::string> hostile = {
         "/sbin/mdadm", "", "a b", "$(reboot)", "new\nline\n", "'\"`\\", "\x01\x7f\xff", "0001 x", "...", "-E", "~"};
@@ -81,7 +81,7 @@ TEST(Scenario, DoesNotTakeOneVectorForAnother)
     }
 }
 
-TEST(Scenario, KeepsTheOrderUnlessToldOtherwise)
+TEST(Scenario, KeepsTheOrderByDefault)
 {
     for (const bool any_order : {false, true}) {
         Scenario scenario;
@@ -98,7 +98,7 @@ TEST(Scenario, KeepsTheOrderUnlessToldOtherwise)
     }
 }
 
-TEST(Scenario, ToolsHaveEffectsAndDieAsTold)
+TEST(Scenario, ToolsHaveEffectsAndDieAsScripted)
 {
     Scenario scenario;
     scenario.Expect({"/sbin/dhcpcd", "-n", "eth0"}).Runs("#!/bin/sh\necho \"$2\" >/tmp/lease\n").DiesOf(SIGKILL);

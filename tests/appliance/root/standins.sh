@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# Start-up scripts start, stop and misbehave as they are told; ps lists what runs.
+# Start-up scripts start, stop and misbehave as scripted; ps lists the running processes.
 . "$(dirname "$0")/common.sh"
 form=namespaces
 rc=/usr/tavo/etc/rc.d
@@ -29,14 +29,14 @@ garbage|start|0 not a number 1
 stale|start|0 N 1 
 late|start|0 1 
 END
-same 'who refuses to die' '1 1' "$(inside "
+same 'a daemon that ignores SIGTERM' '1 1' "$(inside "
     echo stubborn >/var/standin/dms.mode; $rc/S86tavodms.sh start; $rc/S86tavodms.sh stop; echo \$? \$(ps -I | grep -c '[b]in/dms')")"
 same 'a script that fails, one with a hook' $'4\nhooked stop\n9' "$(inside "
     echo 4 >/var/standin/S04crond.sh.status; $rc/S04crond.sh start; echo \$?
     printf '#!/bin/sh\necho hooked \$1; exit 9\n' >/var/standin/S83nfsd.sh.hook; chmod 755 /var/standin/S83nfsd.sh.hook
     $rc/S83nfsd.sh stop; echo \$?")"
 
-# A kernel thread has no arguments, so its name stands in brackets; any other line is the pid and the arguments.
+# A kernel thread has no arguments, so its name is in brackets; any other line is the pid and the arguments.
 same 'a kernel thread' '[nfsd]' "$(inside "$rc/S83nfsd.sh start; ps -I | sed 's/^ *[0-9]* //' | grep nfsd | grep -v 'S83\|grep'")"
 same 'one process, one line' '7 /tmp/sleep 100 a b 1' "$(inside '
     ln -s /bin/busybox /tmp/sleep

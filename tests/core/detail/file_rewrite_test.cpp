@@ -1,4 +1,4 @@
-// What a rewrite keeps of the old file, where it goes, and what it leaves behind when it fails.
+// Rewriting files: what is kept of the old file, which file is replaced, and what a failure leaves.
 #include "core/detail/file_rewrite.h"
 
 #include "core/detail/file_append.h"
@@ -93,7 +93,7 @@ TEST_F(FileRewriteTest, FollowsLinksAndKeepsThem)
     EXPECT_THAT(dir_.Names(), ElementsAre("chain", "dangling", "dirlink", "link", "loop", "real"));
 }
 
-TEST_F(FileRewriteTest, RefusesWhatIsNoFile)
+TEST_F(FileRewriteTest, RefusesAnythingButAFile)
 {
     ASSERT_EQ(::mkfifo((dir_ / "fifo").c_str(), 0644), 0);
     for (const std::string &path : {dir_ / "fifo", dir_.Path(), dir_ / "none/file", dir_ / "none/", std::string(),
@@ -128,7 +128,7 @@ TEST_F(FileRewriteTest, ReadsTheWholeOldText)
     EXPECT_THAT(text, testing::HasSubstr("VmPeak"));
 }
 
-TEST_F(FileRewriteTest, RemovesATemporaryFileThatTookNoPlace)
+TEST_F(FileRewriteTest, RemovesAnUnusedTemporaryFile)
 {
     test::WriteFile(file_, "old");
     {
@@ -141,7 +141,7 @@ TEST_F(FileRewriteTest, RemovesATemporaryFileThatTookNoPlace)
     EXPECT_THAT(dir_.Names(), ElementsAre("file"));
 }
 
-TEST_F(FileRewriteTest, AppendsBehindATornLine)
+TEST_F(FileRewriteTest, AppendsAfterATornLine)
 {
     struct Row {
         const char *old_text, *new_text;

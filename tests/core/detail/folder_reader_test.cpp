@@ -1,4 +1,4 @@
-// Reading folders to their end, or knowing that it was not reached.
+// Reading folders to their end, or reporting that the end was not reached.
 #include "core/detail/folder_reader.h"
 
 #include "core/detail/open_file.h"
@@ -33,13 +33,13 @@ namespace {
 std::vector<std::string> NamesOf(tavo::FolderReader &folder)
 {
     std::vector<std::string> names;
-    errno = EEXIST;  // an error of earlier calls is none of the folder's
+    errno = EEXIST;  // an earlier error must not look like the folder's
     while (const char *const name = folder.Next())
         names.emplace_back(name);
     return names;
 }
 
-TEST(FolderReader, HandsOutEveryNameButTheTwoDots)
+TEST(FolderReader, ReturnsEveryNameButTheTwoDots)
 {
     const test::ScratchDir dir;
     const std::vector<std::string> names = {"...", ".a", "..b", "file", "folder"};
@@ -55,7 +55,7 @@ TEST(FolderReader, HandsOutEveryNameButTheTwoDots)
     EXPECT_EQ(test::OpenDescriptors(), before);
 }
 
-TEST(FolderReader, WhatCannotBeReadIsNotEmpty)
+TEST(FolderReader, ReportsAnUnreadableFolder)
 {
     const test::ScratchDir dir;
     test::WriteFile(dir / "file", "");

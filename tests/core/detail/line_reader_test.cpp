@@ -1,4 +1,4 @@
-// Lines of any length with any byte in them, wherever the reads happen to end.
+// Lines of any length with any bytes, wherever the reads happen to end.
 #include "core/detail/line_reader.h"
 
 #include "core/detail/open_file.h"
@@ -43,7 +43,7 @@ TEST(LineReader, KeepsEveryByte)
     }
 }
 
-TEST(LineReader, JoinsWhatArrivesInPieces)
+TEST(LineReader, JoinsLinesThatArriveInPieces)
 {
     int ends[2];
     ASSERT_EQ(::pipe(ends), 0);
@@ -59,7 +59,7 @@ TEST(LineReader, JoinsWhatArrivesInPieces)
     writer.join();
 }
 
-TEST(LineReader, TellsAnErrorFromTheEnd)
+TEST(LineReader, DistinguishesAnErrorFromTheEnd)
 {
     const tavo::Fd directory = tavo::OpenFd("/", O_RDONLY);
     tavo::LineReader reader(directory.Get());

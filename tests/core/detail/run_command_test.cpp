@@ -1,4 +1,4 @@
-// Running commands: status, surroundings, what is left behind.
+// Running commands: status, environment, leftovers.
 #include "core/detail/run_command.h"
 
 #include "core/detail/command_output.h"
@@ -46,7 +46,7 @@ void OnChild(int)
 {
 }
 
-TEST(RunCommand, StatusWhateverTheCallerDoesWithItsChildren)
+TEST(RunCommand, ReturnsTheStatusForEverySigchldSetting)
 {
     const struct {
         const char *command;
@@ -113,8 +113,8 @@ TEST(RunCommand, ClosedStandardDescriptorsAreTheNullDevice)
     }
 }
 
-// A caller that ignores SIGCHLD never waits: what ended while a command ran must not stay behind as a zombie.
-TEST(RunCommand, LeavesNoZombieOfAnIgnoringCaller)
+// A caller that ignores SIGCHLD never waits: a child that ends while a command runs must not remain a zombie.
+TEST(RunCommand, LeavesNoZombieWhenSigchldIsIgnored)
 {
     const ChildAction ignore(SIG_IGN, 0);
     const pid_t other = ::fork();
@@ -151,7 +151,7 @@ TEST(RunCommand, FixedPathAndLocaleAndNothingInherited)
     ::signal(SIGPIPE, SIG_DFL);
 }
 
-TEST(RunCommand, ThousandRunsLeaveNothing)
+TEST(RunCommand, ThousandRunsLeakNothing)
 {
     const int before = OpenDescriptors();
     for (int i = 0; i < 334; ++i) {
@@ -180,7 +180,7 @@ TEST(CommandOutput, Lines)
     EXPECT_EQ(partly.Status(), 5);
 }
 
-// A daemon has closed its standard descriptors: the pipe must not land on them.
+// A daemon has closed its standard descriptors: the pipe must not get their numbers.
 TEST(CommandOutput, WithoutStandardDescriptors)
 {
     const pid_t child = ::fork();

@@ -1,4 +1,4 @@
-// Composing commands: what goes in as it is, what is quoted, and what no command may carry.
+// Composing commands: what is inserted unchanged, what is quoted, and what is refused.
 #include "core/detail/shell_command.h"
 
 #include "core/detail/command_output.h"
@@ -12,7 +12,7 @@ using tavo::ShellCommand;
 
 namespace {
 
-TEST(ShellCommand, PlainArgumentsKeepTheKnownText)
+TEST(ShellCommand, PlainArgumentsAreUnchanged)
 {
     EXPECT_EQ(
         ShellCommand("/sbin/sfdisk -N%d -uS -q -f -j%llu -z-1 -t%x -F %s >/dev/null 2>&1", 3, 63ull, 0xfdu, "/dev/sda"),
@@ -24,7 +24,7 @@ TEST(ShellCommand, PlainArgumentsKeepTheKnownText)
         "mdadm -C /dev/md2 -pls -c64 -1 a 'b c'");
 }
 
-// Each argument must come out of the shell as it went in, and nothing but it: also within the format's own quotes.
+// Each argument must come out of the shell unchanged and alone, also within the format's own quotes.
 TEST(ShellCommand, HostileArgumentsComeOutOfTheShellUnchanged)
 {
     for (const std::string text :
@@ -43,7 +43,7 @@ TEST(ShellCommand, HostileArgumentsComeOutOfTheShellUnchanged)
     EXPECT_EQ(ShellCommand("mv '%s' '%s' > /dev/null 2>&1", "/a b", "/it's"), "mv '/a b' '/it'\\''s' > /dev/null 2>&1");
 }
 
-TEST(ShellCommand, RefusesOptionsAndWhatTheShellCannotCarry)
+TEST(ShellCommand, RefusesOptionsAndNulBytes)
 {
     for (const std::string_view text : {std::string_view("-"), std::string_view("-rf"),
                                         std::string_view("--zero-superblock /"), std::string_view("a\0b", 3)}) {

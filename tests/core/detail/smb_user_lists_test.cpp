@@ -5,7 +5,7 @@
 
 namespace {
 
-// alice becomes "al", bob goes, the group staff becomes "the staff".
+// alice becomes "al", bob is removed, the group staff becomes "the staff".
 std::optional<std::string> Change(std::string_view name, bool is_group)
 {
     if (!is_group && name == "alice")

@@ -1,4 +1,4 @@
-// Log lines: formats with typed arguments, and nothing that an argument says can break out of its line.
+// Log lines: formats with typed arguments. No argument can break out of its line.
 #include "core/detail/log.h"
 
 #include "support/captured_log.h"
@@ -37,9 +37,9 @@ TEST(WriteLog, KeepsArgumentsInTheirLine)
     EXPECT_EQ(errno, EBADF);
 }
 
-TEST(LogError, SaysModuleAndLine)
+TEST(LogError, BeginsWithModuleAndLine)
 {
-    // This file is not one of the library's.
+    // This file is not part of the library.
     test::CapturedLog log;
     LogError({"%s:%d Parameter error", 37});
     LogDebug("%s:%d here");

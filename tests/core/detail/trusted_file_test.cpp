@@ -43,7 +43,7 @@ class TrustedFile : public testing::Test {
                       name_ = public_ + "/name";
 };
 
-TEST_F(TrustedFile, OnlyOurOwnIsOpenedWhereEverybodyMayWrite)
+TEST_F(TrustedFile, OpensOnlyOurOwnFilesInPublicFolders)
 {
     const struct {
         const char *what;
@@ -67,7 +67,7 @@ TEST_F(TrustedFile, OnlyOurOwnIsOpenedWhereEverybodyMayWrite)
             const int error = errno;
             EXPECT_EQ(static_cast<bool>(fd), row.error == 0) << row.what;
             if (row.error != 0) {
-                // The kernel may refuse what is somebody else's by itself (fs.protected_regular).
+                // The kernel itself may refuse another user's file (fs.protected_regular).
                 EXPECT_THAT(error, testing::AnyOf(row.error, EACCES)) << row.what;
             } else {
                 EXPECT_EQ(test::ReadFile(name_), (flags & O_TRUNC) || row.what[0] == 'n' ? "" : "old") << row.what;
@@ -79,7 +79,7 @@ TEST_F(TrustedFile, OnlyOurOwnIsOpenedWhereEverybodyMayWrite)
     EXPECT_THAT(dir_.Names(), ElementsAre("public", "victim")) << "nothing is made through a link";
 }
 
-TEST_F(TrustedFile, ElsewhereTheAdministratorsLinksAndDevicesCount)
+TEST_F(TrustedFile, FollowsLinksAndOpensDevicesElsewhere)
 {
     const std::string link = dir_ / "link", dangling = dir_ / "dangling";
     ASSERT_EQ(::symlink(victim_.c_str(), link.c_str()), 0);
@@ -109,7 +109,7 @@ TEST_F(TrustedFile, ModesDoNotDependOnTheUmask)
     EXPECT_EQ(ModeOf(name_), 0600u) << "what exists keeps its mode";
 }
 
-TEST_F(TrustedFile, WhatIsForeignIsMovedAsideWhole)
+TEST_F(TrustedFile, MovesForeignFilesAside)
 {
     const std::string below = name_ + "/below";
     const struct {

@@ -1,4 +1,4 @@
-// The error state: what sets it, what reads it, and the log file routines beside it.
+// The error state and the log file routines.
 #include "tavo_error.h"
 
 #include "support/captured_log.h"
@@ -36,7 +36,7 @@ TEST(ErrorState, CodeAndSourceGoTogether)
     EXPECT_EQ(TLIBErrGet(), 0x0900) << "the volume module's cell is another one";
 }
 
-TEST(ErrorTable, NamesStandAtTheirCodes)
+TEST(ErrorTable, NamesAreAtTheirCodes)
 {
     EXPECT_EQ(errNum, 145);
     EXPECT_EQ(codeNum, 96);
@@ -143,7 +143,7 @@ TEST(ErrorLogSet, Refuses)
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
 }
 
-// In a directory that everybody may write to, somebody else's link or FIFO must not catch root; elsewhere a link is the
+// In a directory that everybody may write to, another user's link or FIFO must not trap root. Elsewhere a link is the
 // administrator's own.
 TEST(ErrorLog, TrapsInPublicDirectories)
 {
@@ -169,7 +169,7 @@ TEST(ErrorLog, TrapsInPublicDirectories)
     EXPECT_EQ(TLIBErrLogSet((private_dir + "/link").c_str(), "x"), 0);
     EXPECT_EQ(test::ReadFile(target), "mine\nx\n");
 
-    // A hard link is a second name of a file of ours, for instance of a settings file on the same disk.
+    // A hard link is a second name of one of our files, for instance of a settings file on the same disk.
     const std::string hard = open_dir + "/hard", theirs = open_dir + "/theirs";
     ASSERT_EQ(::link(target.c_str(), hard.c_str()), 0);
     test::WriteFile(theirs, "theirs\n");

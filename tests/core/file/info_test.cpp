@@ -21,7 +21,7 @@ int renames_under_lock;
 
 }  // namespace
 
-// In place of the C library's: sees whether the settings' lock is held exclusively at the moment that counts.
+// In place of the C library's: checks that the settings' lock is held exclusively at the rename.
 extern "C" int rename(const char *from, const char *to) noexcept
 {
     const TLIBLOCKFILE &lock = rgslckList[0];

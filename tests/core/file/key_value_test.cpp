@@ -140,7 +140,7 @@ TEST_F(KeyValueTest, SetAndAppendCreateAMissingFile)
     EXPECT_THAT(dir_.Names(), ElementsAre("append", "set"));
 }
 
-TEST_F(KeyValueTest, WritersRefuseWhatCouldNotBeReadBack)
+TEST_F(KeyValueTest, WritersRefuseUnreadableValues)
 {
     Write("key=1\n");
     struct Row {

@@ -39,7 +39,7 @@ class KeysTest : public testing::Test {
 
 constexpr const char *kText = "a=1\n#a=0\nb = \"two words\"\nno sign\nempty=\na=3\n=c=4\n\"d\"=5\n";
 
-TEST_F(KeysTest, WithoutAWishTheLastOfEachKeyCounts)
+TEST_F(KeysTest, WithoutWantedKeysTheLastLineCounts)
 {
     test::WriteFile(file_, kText);
     StringHash hash(Pairs{{"kept", "yes"}});
@@ -49,7 +49,7 @@ TEST_F(KeysTest, WithoutAWishTheLastOfEachKeyCounts)
     EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), ListOf({}).get(), same.Addr(), "="), 4);
 }
 
-TEST_F(KeysTest, WantedKeysCountTheirFirstLine)
+TEST_F(KeysTest, OfWantedKeysTheFirstLineCounts)
 {
     test::WriteFile(file_, kText);
     StringHash hash;

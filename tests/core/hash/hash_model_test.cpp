@@ -40,8 +40,8 @@ class Model {
         return -1;
     }
 
-    // Where a key goes that is not there: home when unused; the first removed pair behind home; home when removed; the
-    // first unused slot.
+    // Where a missing key goes: home when unused; the first removed pair after home; home when removed; the first
+    // unused slot.
     int FreeSlot(const std::string &key) const
     {
         const size_t home = Home(key);

@@ -1,4 +1,4 @@
-// Hashes: what each function gives, refuses, and leaves behind.
+// Hashes: results, refusals and states of each function.
 #include "tavo_hash.h"
 
 #include "support/container_text.h"
@@ -79,8 +79,7 @@ TEST(HashSetValue, GrowsWithTheKeys)
     }
 }
 
-// One value that keeps growing makes the area grow thirtyfold each time: it has to end in a refusal, not in an
-// overflow.
+// One growing value makes the area grow thirtyfold each time. This has to end in a refusal, not in an overflow.
 TEST(HashSetValue, RefusesBeforeTheCountersOverflow)
 {
     Hash hash(PshTLIBSzHashAlloc(1 << 26));
@@ -94,8 +93,8 @@ TEST(HashSetValue, RefusesBeforeTheCountersOverflow)
     EXPECT_EQ(hash->nStrSize, 1 << 26);
 }
 
-// Keys that all begin at one slot: the writing look-up offers removed pairs behind the home slot only.
-TEST(HashLookDict, WritingPrefersARemovedPairBehindHome)
+// Keys that all begin at one slot: the writing look-up returns removed pairs after the home slot only.
+TEST(HashLookDict, WritingPrefersARemovedPairAfterHome)
 {
     Hash hash(PshTLIBSzHashAlloc(512));
     const auto key = [](int i) {
@@ -122,7 +121,7 @@ TEST(HashLookDict, WritingPrefersARemovedPairBehindHome)
     EXPECT_EQ(Pairs(hash.get()), (PairMap{{key(2), "2"}, {key(3), "3"}, {key(4), "4"}}));
 }
 
-// Keys and values that the hash handed out may go back in, also when it moves meanwhile.
+// Keys and values from the hash may be stored again, also when storing moves the hash.
 TEST(HashSetValue, TakesItsOwnStrings)
 {
     Hash hash = MakeHash({{"k0", "value 0"}});
@@ -155,7 +154,7 @@ TEST(HashEnumKey, ListsInSlotOrder)
     EXPECT_EQ(TLIBSzHashGetLength(hash.get()), 4);
 }
 
-// The steps that callers may put together themselves.
+// The steps that callers may combine themselves.
 TEST(HashSteps, WorkAlone)
 {
     const PairMap pairs = Numbered(20);
@@ -263,7 +262,7 @@ TEST(Hash, RefusesWithOrWithoutACode)
     EXPECT_EQ(Pairs(hash.get()), (PairMap{{"k", "v"}}));
 }
 
-TEST(HashDump, ShowsPairsAndWhatWasRemoved)
+TEST(HashDump, ShowsPairsAndRemovedOnes)
 {
     const Hash hash = MakeHash({{"a", "1"}, {"b", "2"}});
     SzTLIBSzHashRemoveKey(hash.get(), "b");

@@ -14,7 +14,7 @@ namespace {
 
 constexpr int kOperations = 600000;
 
-// What the list is to do, on a vector: counts bytes as the appliance does.
+// The expected list, on a vector; counts bytes as the appliance does.
 class Model {
   public:
     struct Item {
@@ -25,7 +25,7 @@ class Model {
     std::vector<Item> items;
     int size = 512;
     int mode = 0;
-    int stored = 0;  // bytes of strings since the block was made
+    int stored = 0;  // bytes of strings since the block was created
 
     int Count() const { return static_cast<int>(items.size()); }
     int Free() const { return size - 24 - 4 * Count() - stored; }
@@ -105,7 +105,7 @@ class Model {
             Expand();
     }
 
-    // The first string of a block ends in the byte that all holes share: when it is empty it is a hole.
+    // The first string of a block ends in the byte that all holes share: an empty first string is a hole.
     Item Store(const std::string &text)
     {
         const bool hole = text.empty() && stored == 0;
@@ -225,7 +225,7 @@ class Pair {
             StartAnew();
     }
 
-    // Equal items may stand in any order: the list's is taken over once it is seen to be an order of the same items.
+    // Equal items may be in any order. The model adopts the list's order once it is checked to be a valid one.
     void TakeOrder()
     {
         std::vector<Model::Item> ordered;
@@ -262,7 +262,7 @@ class Pair {
         }
     }
 
-    // A string of the list itself, also one that was taken out of it, goes in again.
+    // Adds a string of the list itself again, also one that was removed from it.
     void PutsOwnString()
     {
         if (model_.Count() == 0)

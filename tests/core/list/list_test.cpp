@@ -1,4 +1,4 @@
-// Lists: published numbers, orders, sets, refusals. What the single operations do to a list list_model_test compares.
+// Lists: published numbers, orders, sets, refusals. list_model_test checks the effects of the single operations.
 #include "tavo_list.h"
 
 #include "support/captured_log.h"
@@ -84,7 +84,7 @@ TEST(ListInsert, FoldsBeyondAscii)
     EXPECT_EQ(TLIBSzListCaseFind(folded.get(), "ä"), 4);
 }
 
-// A part of a string that a list handed out may go back into that list.
+// A part of a string from the list may be stored in that list.
 TEST(ListSet, TakesPartsOfItsOwnStrings)
 {
     List list = MakeList({"abcdef", "x"});
@@ -135,8 +135,8 @@ TEST(ListSort, OnlyAnUnsortedListIsSorted)
     }
 }
 
-// Text that is not UTF-8 compares with nothing, but still has to have one place in the order.
-TEST(ListSort, PutsWhatIsNotUtf8Last)
+// Text that is not UTF-8 does not compare, but still needs one place in the order.
+TEST(ListSort, PutsInvalidUtf8Last)
 {
     List list = MakeList({"\xff", "b", "a\xc3", "A", "\xe4pfel", "Z"}, TLIB_SZLIST_CASESORTED);
     EXPECT_THAT(Items(list.get()), ElementsAre("A", "b", "Z", "a\xc3", "\xe4pfel", "\xff"));
@@ -161,7 +161,7 @@ TEST(ListSort, PutsWhatIsNotUtf8Last)
     }
 }
 
-TEST(ListFind, BinarySearchTellsThePlace)
+TEST(ListFind, BinarySearchReturnsThePlace)
 {
     const List list = MakeList({"b", "d", "f"}, TLIB_SZLIST_SORTED);
     const struct {
@@ -276,7 +276,7 @@ TEST(ListSets, KeepTheOrderOfTheFirst)
     for (const auto &row : rows) {
         for (const int flags : {0, static_cast<int>(TLIB_SZLIST_NEW)}) {
             SCOPED_TRACE(testing::PrintToString(row.a) + testing::PrintToString(row.b) + std::to_string(flags));
-            // A hole in either takes no part.
+            // Holes in either list are ignored.
             List a = MakeList(row.a, row.a_mode);
             List b = MakeList(row.b, row.b_mode);
             if (!row.a_mode)
@@ -323,7 +323,7 @@ TEST(ListSets, OfAListWithItself)
     }
 }
 
-// A list that was only labelled as sorted may hold holes: they match nothing, not even an empty string that was stored.
+// A list that was only labelled as sorted may hold holes: they match nothing, not even a stored empty string.
 TEST(ListSets, HolesOfALabelledListMatchNothing)
 {
     const List a = MakeList({"z", ""}, TLIB_SZLIST_SORTED);
@@ -394,7 +394,7 @@ TEST(List, RefusesAndChangesNothing)
     char buffer[4];
     const struct {
         const char *name;
-        std::function<bool()> call;  // true: the failure value came back
+        std::function<bool()> call;  // true: the function returned its failure value
         Fault fault;
     } rows[] = {
 #define INT(call)                                                                                                      \
@@ -450,7 +450,7 @@ TEST(List, RefusesAndChangesNothing)
         {INT(TLIBSzListDump2Str(addr, ",", buffer, 0)), {ERR_BAD_PARAMETERS, "list_dump_2_str", 36}},
         {INT(TLIBISzListFind(nullptr, 0, 0, "a", 0)), {ERR_BAD_PARAMETERS, "list_find"}},
         {PTR(PslTLIBISzListExpand(nullptr)), {ERR_BAD_PARAMETERS, "list_expand"}},
-        // Looking in vain is no failure.
+        // Finding nothing is not a failure.
         {INT(TLIBSzListFind(addr, "x")), {}},
         {INT(TLIBSzListFind(sorted.get(), "x")), {}},
         {INT(TLIBSzListCaseFind(addr, "\xff")), {}},

@@ -1,4 +1,4 @@
-// Many processes at one lock.
+// Many processes compete for one lock.
 #include "tavo_lock.h"
 
 #include <gtest/gtest.h>
@@ -20,7 +20,7 @@ constexpr int kWriters = 50;
 constexpr int kReaders = 8;
 constexpr int kIncrements = sizeof(void *) == 4 ? 100 : 1000;  // an emulated processor needs minutes for more
 
-// Two counters that only agree while nobody is in the middle of an increment.
+// Two counters that only agree while no process is in the middle of an increment.
 struct Shared {
     volatile long first;
     volatile long second;
@@ -29,9 +29,9 @@ struct Shared {
 void Write(Shared &shared, int seed)
 {
     for (int i = 0; i < kIncrements; ++i) {
-        // Most wait in the kernel, some come and go; both must exclude each other.
+        // Most wait in the kernel, some poll; both must exclude each other.
         while (ErrTLIBFileLock(0x400u | (i % 7 == seed % 7 ? 6u : 2u), 0) != 0)
-            ::usleep(500);  // spinning would keep the holder from its end
+            ::usleep(500);  // spinning would delay the holder's end
         shared.first = shared.first + 1;
         if (i % 128 == 0)
             ::sched_yield();
@@ -88,7 +88,7 @@ TEST(LockStorm, SumsAreExactAmongReadersAndKilledHolders)
     for (int i = 0; i < kWriters; ++i)
         writers.push_back(Start([&, i] { Write(shared, i); }));
 
-    // Holders die at any moment: on the way into the lock, within it, on the way out.
+    // Holders die at any moment: while taking the lock, while holding it, while releasing it.
     std::minstd_rand random(7);
     int left = kWriters, failures = 0, killed = 0;
     while (left > 0) {

@@ -1,4 +1,4 @@
-// The locks: counting, refusals, time-outs, forked children, and what others may have put in /tmp.
+// The locks: counting, refusals, time-outs, forked children, and traps in /tmp.
 #include "tavo_lock.h"
 
 #include "support/appliance_root.h"
@@ -42,10 +42,10 @@ namespace {
 
 constexpr long long kRetry = 50'000'000;  // nanoseconds
 
-// Sleeps are recorded, not slept; both hooks may change the world or fail.
+// Sleeps are recorded, not slept; both hooks may change the state or fail.
 std::vector<long long> sleeps;
 std::function<bool(timespec *left)> on_sleep;         // false: interrupted
-std::function<bool(int fd, int operation)> on_flock;  // false: errno is the answer
+std::function<bool(int fd, int operation)> on_flock;  // false: errno has the reason
 
 }  // namespace
 
@@ -96,7 +96,7 @@ class Lock : public testing::Test {
     }
 };
 
-// Another program's lock: another open file, which excludes this process as well as any other.
+// Another program's lock: another open file, which excludes this process like any other.
 class ForeignHold {
   public:
     ForeignHold(unsigned bit, int operation)
@@ -126,7 +126,7 @@ bool IsFree(unsigned bit, int operation)
     return free;
 }
 
-TEST(LockTable, IsTheKnownOne)
+TEST(LockTable, KeepsItsOrder)
 {
     const struct {
         const char *name;
@@ -183,7 +183,7 @@ TEST_F(Lock, SharedDoesNotBecomeExclusive)
         SCOPED_TRACE(std::to_string(row.held) + " to " + std::to_string(row.wanted));
         ASSERT_EQ(ErrTLIBFileLock(0x20 | row.held, 0), 0);
         test::ForgetFault();
-        // lock_tavoinfo stands before lock_gr, so it is taken first and must be given back.
+        // A request takes lock_tavoinfo before lock_gr, so it must give lock_tavoinfo back.
         EXPECT_EQ(ErrTLIBFileLock(0x820 | row.wanted, 60), row.refused ? -1 : 0);
         EXPECT_EQ(Entry(0x20).nRef, row.refused ? 1 : 2);
         EXPECT_EQ(Entry(0x20).nMode, static_cast<int>(row.held));
@@ -214,7 +214,7 @@ TEST_F(Lock, TriesAgainTwentyTimesASecond)
         EXPECT_EQ(Entry(0x100).nRef, 0);
     }
 
-    // The last retry counts, and a limit of many years is none that overflows.
+    // The last retry counts, and a limit of many years does not overflow.
     for (const int timeout : {1, INT_MAX}) {
         ForeignHold again(0x400, LOCK_SH);
         sleeps.clear();
@@ -229,7 +229,7 @@ TEST_F(Lock, TriesAgainTwentyTimesASecond)
     }
 }
 
-// Programs have children, and children die while one waits: that is no answer about the lock and shortens no wait.
+// Programs have children that die during a wait. A child's death says nothing about the lock and shortens no wait.
 TEST_F(Lock, SignalsNeitherFailNorShortenAWait)
 {
     ForeignHold busy(0x100, LOCK_EX);
@@ -257,7 +257,7 @@ TEST_F(Lock, SignalsNeitherFailNorShortenAWait)
     }
 }
 
-TEST_F(Lock, RefusesWhatIsNoWayToLock)
+TEST_F(Lock, RefusesInvalidRequests)
 {
     for (const unsigned request : {0x800u, 0x803u, 0x804u, 0x807u, 0x808u, 0x80Cu, 0x80Eu, 0x1000806u}) {
         test::ForgetFault();
@@ -333,7 +333,7 @@ TEST_F(Lock, CloseReportsAFailure)
     EXPECT_EQ(Entry(0x800).pfLock, nullptr);
 }
 
-TEST_F(Lock, DirectoryAndFilesAreMadeWhateverTheUmask)
+TEST_F(Lock, CreatesDirectoryAndFilesUnderEveryUmask)
 {
     const mode_t mask = ::umask(0777);
     EXPECT_EQ(ErrTLIBFileLock(0x806, 0), 0);
@@ -374,9 +374,9 @@ TEST_F(Lock, TrapsAtTheDirectory)
     fs::remove_all("/tmp/elsewhere");
 }
 
-// Somebody may have created the name before the appliance does. That stops no call of root's and makes it touch nothing
-// that it does not know.
-TEST_F(Lock, MovesAsideWhatIsNotRoots)
+// Another user may have created the name before the appliance does. That must not stop root, and root must not touch
+// unknown files.
+TEST_F(Lock, MovesAsideFilesOfOtherUsers)
 {
     for (const test::Plant plant : test::kPlants) {
         test::PlantAt("/tmp/lock", plant);
@@ -397,8 +397,8 @@ TEST_F(Lock, MovesAsideWhatIsNotRoots)
     test::RemovePlanted("/tmp/lock");
 }
 
-// Reading a file is enough to hold its lock for ever, so nobody else may open one.
-TEST_F(Lock, OtherUsersTakeNoneAndDoNotWait)
+// Every reader of a file can hold its lock for ever, so no other user may open one.
+TEST_F(Lock, OtherUsersFailAtOnce)
 {
     ASSERT_EQ(ErrTLIBILockCheckDir(), 0);
     EXPECT_EQ(test::InChild([] {
@@ -416,7 +416,7 @@ TEST_F(Lock, OtherUsersTakeNoneAndDoNotWait)
               0);
 }
 
-TEST_F(Lock, WhoGivesUpNamesALockAndItsHolder)
+TEST_F(Lock, ATimeOutLogsTheLockAndItsHolder)
 {
     SKIP_WITHOUT_PROC();
     ASSERT_EQ(ErrTLIBILockCheckDir(), 0);
@@ -458,9 +458,9 @@ TEST_F(Lock, TrapsAtALockFile)
     fs::remove("/tmp/victim");
 }
 
-// A cleaner of /tmp, or a second instance of the appliance's start-up, removes the files of a lock that is being taken:
-// whoever comes next locks a new file, so a lock on the old one would exclude nobody.
-TEST_F(Lock, HoldsTheFileThatHasTheName)
+// A cleaner of /tmp, or a second instance of the appliance's start-up, removes the files of a lock that is being taken.
+// The next program locks a new file, so a lock on the old one would exclude no other process.
+TEST_F(Lock, LocksTheFileUnderItsCurrentName)
 {
     for (const bool whole_directory : {false, true}) {
         int cleanings = 3;

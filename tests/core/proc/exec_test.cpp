@@ -1,4 +1,4 @@
-// Running programs: their status, what they inherit and what they do not, what is left behind.
+// Running programs: their status, their inheritance, their leftovers.
 #include "tavo_lock.h"
 #include "tavo_proc.h"
 
@@ -84,7 +84,7 @@ int StatusOf(pid_t pid)
     return status;
 }
 
-// What a program finds, written by a shell to the file $0.
+// The environment of a program, written by a shell to the file $0.
 constexpr char kDescribe[] = R"(exec > "$0"
 for fd in 0 1 2; do readlink /proc/self/fd/$fd; done | head -1
 pwd
@@ -117,7 +117,7 @@ TEST(Exec, StatusIsTheResult)
     EXPECT_EQ(TLIBSystem(nullptr), 0);
 }
 
-TEST(Exec, WhatCannotBeExecuted)
+TEST(Exec, UnexecutableFiles)
 {
     const test::ScratchDir dir;
     test::WriteFile(dir / "text", "no program\n", 0755);
@@ -226,8 +226,8 @@ TEST(Exec, DescriptorsAndLocks)
     ::close(open_one);
 }
 
-// A caller without standard descriptors: /dev/null lands on one of them and must stay.
-TEST(Exec, FromAProcessThatHasClosedItsOwn)
+// A caller without standard descriptors: /dev/null gets one of their numbers and must stay.
+TEST(Exec, FromAProcessWithoutStandardDescriptors)
 {
     SKIP_WITHOUT_PROC();
     const test::ScratchDir dir;
@@ -280,7 +280,7 @@ TEST(Exec, SignalsAreAtTheirDefaults)
     ::signal(SIGUSR2, SIG_DFL);
 }
 
-TEST(Exec, StatusWhateverTheCallerDoesWithItsChildren)
+TEST(Exec, ReturnsTheStatusForEverySigchldSetting)
 {
     const struct {
         void (*handler)(int);
@@ -307,7 +307,7 @@ TEST(Exec, StatusWhateverTheCallerDoesWithItsChildren)
     }
 }
 
-TEST(Exec, RunsLeaveNothingBehind)
+TEST(Exec, RunsLeakNothing)
 {
     TLIBTimedExec(60, "/bin/true", NULL);
     const auto before = test::OpenDescriptors();

@@ -27,7 +27,7 @@ std::string Number(long number)
     return std::to_string(number) + "\n";
 }
 
-TEST(PidFile, WhatIsANumber)
+TEST(PidFile, ParsesOneNumber)
 {
     const std::string own = std::to_string(::getpid());
     const struct {
@@ -109,8 +109,8 @@ TEST(PidFile, Refusals)
     }
 }
 
-// Root signals for others, so a file that somebody else could have written speaks for that somebody's processes only.
-TEST(PidFile, ForeignFilesSpeakForTheirOwnersProcesses)
+// Root signals any process, so a file that another user could have written counts for that user's processes only.
+TEST(PidFile, ForeignFilesCountForTheirOwnersProcesses)
 {
     SKIP_WITHOUT_PROC();
     test::OwnChild victim([] { ::pause(); });
@@ -152,7 +152,7 @@ TEST(PidFile, ForeignFilesSpeakForTheirOwnersProcesses)
     EXPECT_EQ(::waitpid(victim.Pid(), nullptr, WNOHANG), 0) << "the victim lives";
 }
 
-TEST(PidFile, WhatOthersMayWriteIsNotBelieved)
+TEST(PidFile, IgnoresFilesThatOthersMayWrite)
 {
     const test::ScratchDir dir;
     const std::string path = dir / "x.pid";
@@ -169,7 +169,7 @@ TEST(PidFile, WhatOthersMayWriteIsNotBelieved)
         EXPECT_EQ(TLIBProcSignalByPidFile(path.c_str(), 0), row.believed ? 0 : -1) << std::oct << row.mode;
         EXPECT_EQ(TLIBErrGet(), row.believed ? ERR_SUCCESS : ERR_OPEN_FAILED);
     }
-    // Under a careless umask, too, and over a file that an earlier release made under one.
+    // Also under a careless umask, and over a file that an earlier release created under one.
     for (const mode_t mask : {0u, 0777u}) {
         const mode_t before = ::umask(mask);
         const int made = TAVOProcPidFileCreate((dir / "new.pid").c_str());

@@ -30,7 +30,7 @@ using test::LastFault;
 
 namespace {
 
-// What the shell was told last; other processes write it.
+// The shell's last command; other processes write it.
 char *const last_command =
     static_cast<char *>(::mmap(nullptr, 65536, PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0));
 const char *other_ps = nullptr;  // runs in place of /bin/ps
@@ -74,7 +74,7 @@ class Ps : public testing::Test {
     }
     void TearDown() override { other_ps = nullptr; }
 
-    // The two kinds of ps one after the other.
+    // Runs a case with both kinds of ps.
     template <class Body>
     void WithEither(Body body)
     {
@@ -117,7 +117,7 @@ TEST_F(Ps, CountsAllAndStoresWhatFits)
     });
 }
 
-TEST_F(Ps, TheCommandIsTheKnownOne)
+TEST_F(Ps, TheCommandIsUnchanged)
 {
     TLIBPs("smbd -D", nullptr, 0);
     EXPECT_EQ(last_command, "/bin/ps -I | /bin/grep 'smbd -D' > " + scratch_ + " 2>&1");
@@ -175,7 +175,7 @@ TEST_F(Ps, OutOfMemory)
             faults.Disarm();
             EXPECT_EQ(faults.LeftAllocated(), 0);
             if (count == 5)
-                continue;  // a stream does without a buffer, too
+                continue;  // a stream works without a buffer, too
             EXPECT_EQ(count, -1);
             EXPECT_TRUE(TLIBErrGet() == ERR_OUT_OF_MEMORY || TLIBErrGet() == ERR_READ_FAILED) << TLIBErrGet();
             ASSERT_NE(::access(scratch_.c_str(), F_OK), 0);

@@ -33,7 +33,7 @@ using namespace std::chrono_literals;
 namespace {
 
 bool is_undying = false;  // no signal ends a process
-pid_t undying = 0;        // the last one that got none
+pid_t undying = 0;        // the last process that did not get one
 
 }  // namespace
 
@@ -110,8 +110,8 @@ TEST(TimedExec, StatusIsTheResult)
               27);
 }
 
-// A tenth of a second before the limit a program has made it, a tenth after it has not, whatever else dies meanwhile and
-// however the caller stands to its children. All at the same time, each in a process of its own.
+// A program succeeds a tenth of a second before the limit and fails a tenth after it, whatever other children die
+// meanwhile and whatever the caller has set for SIGCHLD. All cases run at the same time, each in its own process.
 TEST(TimedExec, TheLimitIsExact)
 {
     const struct {
@@ -178,7 +178,7 @@ TEST(TimedExec, TheLimitIsExact)
         finish(run);
 }
 
-TEST(TimedExec, KillsWhatTheProgramHasStartedAndLeavesNoZombie)
+TEST(TimedExec, KillsTheProgramsChildrenAndLeavesNoZombie)
 {
     const test::ScratchDir dir;
     const std::string out = dir / "pid";
@@ -191,13 +191,13 @@ TEST(TimedExec, KillsWhatTheProgramHasStartedAndLeavesNoZombie)
     for (int i = 0; i < 100 && BlTLIBProcAlive(grandchild); ++i) {
         const std::string stat = "/proc/" + std::to_string(grandchild) + "/stat";
         if (::access(stat.c_str(), R_OK) == 0 && test::ReadFile(stat).find(") Z ") != std::string::npos)
-            break;  // dead, and its new parent takes its time
+            break;  // dead, and its new parent is slow
         ::usleep(10000);
         ASSERT_LT(i, 99) << "the program's own child lives on";
     }
 }
 
-// Whether a child that ends leaves a zombie.
+// Whether a child that ends remains a zombie.
 bool LeavesZombie()
 {
     const pid_t child = ::fork();
@@ -212,7 +212,7 @@ bool LeavesZombie()
     return true;
 }
 
-TEST(TimedExec, TheHandlerStaysAndAnIgnoringCallerGetsNoZombies)
+TEST(TimedExec, TheHandlerStaysWithoutZombiesWhenSigchldIsIgnored)
 {
     if (test::InChild([] {
             const ChildAction kernel_collects(SIG_DFL, SA_NOCLDWAIT);
@@ -231,8 +231,8 @@ TEST(TimedExec, TheHandlerStaysAndAnIgnoringCallerGetsNoZombies)
               0);
 }
 
-// The pipe is one a process: a forked child must not take its parent's rings, and after a daemon has closed all its
-// descriptors the numbers belong to other files.
+// One pipe per process: a forked child must not take its parent's rings, and after a daemon has closed all its
+// descriptors their numbers belong to other files.
 TEST(TimedExec, ThePipeIsTheProcessesOwn)
 {
     TLIBTimedExec(9, "/bin/true", NULL);
@@ -263,8 +263,8 @@ TEST(TimedExec, ThePipeIsTheProcessesOwn)
     EXPECT_EQ(test::ReadFile(path), "");
 }
 
-// A program that cannot be read for now, as from a disk that does not answer: somebody else holds a lease on it, which
-// the kernel lets run out after 45 seconds.
+// A program that cannot be read for now, as on a disk that does not answer: another process holds a lease on it, which
+// the kernel revokes after 45 seconds.
 class HeldUpProgram {
   public:
     HeldUpProgram()
@@ -302,7 +302,7 @@ TEST(TimedExec, TheLimitCountsWhileTheProgramIsRead)
     EXPECT_LT(time, 4s);
 }
 
-// What waits for a dead disk does not die, and the caller does not wait for it.
+// A program that waits for a dead disk does not die, and the caller does not wait for it.
 TEST(TimedExec, AChildThatCannotBeKilledIsLeftToALaterCall)
 {
     is_undying = true;
@@ -318,7 +318,7 @@ TEST(TimedExec, AChildThatCannotBeKilledIsLeftToALaterCall)
     EXPECT_TRUE(test::HasNoChildren());
 }
 
-// The child of a program that waits must not hold what its parent has released by dying.
+// The child of a waiting program must not hold locks that its parent has released by dying.
 TEST(TimedExec, ACopyOfTheCallerHoldsNoLock)
 {
     if (test::RootForm().empty())
@@ -337,7 +337,7 @@ TEST(TimedExec, ACopyOfTheCallerHoldsNoLock)
                 ErrTLIBFileUnlock(TAVO_LOCK_RC);
             return held;
         }));
-        ::usleep(300000);  // the copy is at its program
+        ::usleep(300000);  // the copy runs its program
     }
     EXPECT_EQ(ErrTLIBFileLock(TAVO_LOCK_RC | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING, 2), 0);
     ErrTLIBFileUnlock(TAVO_LOCK_RC);

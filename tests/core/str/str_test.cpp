@@ -218,7 +218,7 @@ TEST(Utf8Upper, FollowsTheUnicodeTables)
     }
 }
 
-TEST(Utf8, RefusesWhatIsNotUtf8)
+TEST(Utf8, RefusesInvalidUtf8)
 {
     const char *const rows[] = {"\xff", "a\xc3",    "\xc3(", "\xc0\x80", "\xed\xa0\x80", "\xf4\x90\x80\x80",
                                 "\x80", "b\xe2\x82"};
@@ -230,7 +230,7 @@ TEST(Utf8, RefusesWhatIsNotUtf8)
         EXPECT_STREQ(buffer, "#");
         EXPECT_EQ(TLIBUnicodeUTF8StrCountChar(text), -1);
         EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "unicode_utf8_str_count_char"}));
-        // Also behind the place where the order is already decided.
+        // Also after the place that decides the order.
         for (const std::string before : {"", "z", "Ä"}) {
             EXPECT_EQ(TLIBUnicodeUTF8StrCaseCmp((before + text).c_str(), "a"), -2);
             EXPECT_EQ(TLIBUnicodeUTF8StrCaseCmp("a", (before + text).c_str()), -2);

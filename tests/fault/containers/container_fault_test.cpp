@@ -1,5 +1,5 @@
-// Memory runs out at every single allocation of every function of lists, hashes and strings: the right code, nothing
-// changed, nothing left allocated.
+// Memory runs out at every single allocation of every function of lists, hashes and strings: checks that the code is
+// right, nothing has changed and nothing is left allocated.
 #include "tavo_hash.h"
 #include "tavo_list.h"
 #include "tavo_str.h"
@@ -20,7 +20,7 @@ namespace {
 
 const std::string kLarge(3000, 'x');
 
-// What a call works on: a list and a hash that have no room left for much, and what they hold.
+// The arguments of a call: a list and a hash with little room left, and their contents.
 struct World {
     List list = test::MakeList({"b", "a", "c"});
     List other = test::MakeList({"c", "d", kLarge});
@@ -49,7 +49,7 @@ struct World {
     }
 };
 
-// A result that is a container is kept for the world to free; whether there is one.
+// Keeps a resulting container for the world to free; returns whether there is one.
 bool Keep(World &world, TLIBSZLIST *list)
 {
     if (list && list != world.list.get())
@@ -93,7 +93,7 @@ void FailEachAllocation(const Row &row)
     EXPECT_EQ(faults.Count(), row.allocations);
 }
 
-// Calls a step that hands back the world's hash, which it may have moved, or NULL.
+// Calls a step that returns the world's hash, which it may have moved, or NULL.
 template <class Step>
 bool Replaces(Hash &hash, Step step)
 {
@@ -233,8 +233,8 @@ TEST(ContainerFault, EveryAllocationFailsOnce)
         FailEachAllocation(row);
 }
 
-// A value that the hash has given up may stand just where the new key goes: it is set aside first.
-TEST(ContainerFault, AValueInTheWayOfItsKey)
+// The new key may overwrite a value that the hash has given up: the value is copied first.
+TEST(ContainerFault, AValueThatItsKeyOverwrites)
 {
     test::EachAllocation faults;
     while (faults.Next()) {

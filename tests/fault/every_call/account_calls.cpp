@@ -476,7 +476,8 @@ Family AccountFamily()
         [] { return std::make_shared<Accounts>(); },
         {"/tmp", "/etc", "/usr/tavo/etc"},
     };
-    // What a change of accounts leaves when it fails half-way, and what the next program makes of it, has tests of its own.
+    // Tests of their own cover what a change of accounts leaves when it fails half-way, and how the next program
+    // finishes it.
     for (Call &call : family.calls)
         call.flags |= kAnswers | kSteps;
     return family;

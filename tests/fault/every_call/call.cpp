@@ -1,4 +1,4 @@
-// One call of every exported function: how a call is watched and what it came to.
+// One call of every exported function: how a call is watched and what it returns.
 #include "call.h"
 
 #include "support/failing_malloc.h"

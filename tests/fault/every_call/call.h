@@ -28,18 +28,18 @@ enum : unsigned {
     kNoCode = 2,         // the function has no codes, so a failure may leave none
     kAnswers = 4,        // a failed step is an answer of its own: skipped in a list, "not running", nothing to clear up
     kInChild = 8,        // changes its process, or ends it
-    kMayAbort = 16,      // without a pipe it aborts, as its contract says
+    kMayAbort = 16,      // without a pipe it aborts, as documented
     kNoFaults = 32,      // waits or starts programs by design; faults inside have tests of their own
     kCreates = 64,       // makes the file first and then writes to it
-    kHolds = 128,        // what it opens and allocates, the process keeps
-    kLeavesCode = 256,   // succeeds without a step that failed, and leaves its code
+    kHolds = 128,        // the process keeps what it opens and allocates
+    kLeavesCode = 256,   // succeeds without a failed step, and leaves its code
     kSteps = 512,        // rewrites several files, or one file several times; each rewrite is whole
     kClosesTwice = 1024  // builds stores; a close that fails makes Berkeley DB close twice, and die
 };
 
-// What a call came to, in memory that it shares with the test.
+// The outcome of a call, in memory that it shares with the test.
 struct Report {
-    bool done;    // the body has come to its end
+    bool done;    // the body has finished
     bool failed;  // by its result
     int code;
     int descriptors;  // open afterwards
@@ -123,7 +123,7 @@ struct Call {
         }                                                                                                              \
     }
 
-// A family's calls, and what has to be there before them: files, devices, daemons. It is kept until the family is done.
+// A family's calls, and their surroundings: files, devices, daemons. These are kept until the family is done.
 struct Family {
     const char *name;
     std::vector<Call> calls;
@@ -142,7 +142,7 @@ Family AccountFamily();
 Family NetworkFamily();
 Family ServiceFamily();
 
-// True when a system call that a stand-in made for show was failed by the tracer.
+// True when the tracer failed a system call that a stand-in made for show.
 bool WasFailed(long result);
 
 }  // namespace every_call

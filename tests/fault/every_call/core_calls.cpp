@@ -46,7 +46,7 @@ struct Pair {
 struct Core {
     Core()
     {
-        const test::CapturedLog quiet;  // takes syslog's place and goes: nothing is kept
+        const test::CapturedLog quiet;  // takes syslog's place and drops every line
         std::filesystem::create_directories("/tmp/every_call");
         test::WriteFile(kLines, "# comment\nkey=value\nother=1\nfolder=/a/b\n");
         test::WriteFile(kSections, "# comment\n[one]\nkey=value\n[two]\nother=1\n");

@@ -1,6 +1,6 @@
-// Every exported function is called once; then each of its system calls fails, with each of the errors that a worn disk, a
-// full one, a stranger's file, a busy process and a signal bring; then each of its allocations. Whatever fails, the
-// process lives, no file is half written, and the caller is told the truth.
+// Calls every exported function once. Then each of its system calls fails, with each of the errors of a worn disk, a
+// full one, another user's file, a busy process and a signal; then each of its allocations. Whatever fails, the process
+// lives, no file is half written, and the caller learns the truth.
 #include "call.h"
 
 #include "support/appliance_root.h"
@@ -46,7 +46,8 @@ constexpr int kErrors[] = {EIO, ENOSPC, EACCES, EMFILE, EINTR};
 
 constexpr size_t kMany = 25;  // places in one call
 
-// A change of the accounts has hundreds of places and takes long: of more than so many, a part is tried in turn.
+// A change of the accounts makes system calls from hundreds of places and takes long: of more than so many, a part is
+// tried in turn.
 constexpr size_t kTried = 60;
 
 size_t Step(size_t places)
@@ -65,7 +66,7 @@ std::vector<Family> Families()
             every_call::NetworkFamily(), every_call::ServiceFamily()};
 }
 
-// The names of a version script: what stands alone on a line and ends in a semicolon.
+// The names of a version script: lines with one name and a semicolon.
 std::set<std::string> ExportedNames()
 {
     std::set<std::string> names;
@@ -96,8 +97,8 @@ TEST(EveryCall, EveryExportedNameIsInTheTable)
         EXPECT_TRUE(exported.contains(name)) << name << " is in a table of calls and not exported";
 }
 
-// What may come and go with any call: locks, the caches that are made again from the files, and the journals from which the
-// next program finishes a change.
+// May appear or disappear with any call: locks, the caches that are rebuilt from the files, and the journals from which
+// the next program finishes a change.
 bool IsPassing(const std::string &path)
 {
     for (const std::string_view place : {"/tmp/lock", "/tmp/.db.", "/etc/.tavouser.commit", "/etc/.tavogroup.commit",
@@ -134,7 +135,7 @@ class EveryCall : public testing::TestWithParam<Family> {
             ::munmap(report_, sizeof *report_);
     }
 
-    // TAVO_CALL=NAME in the environment of the program looks at one function alone.
+    // TAVO_CALL=NAME in the environment of the program selects one function.
     static bool IsChosen(const Call &call)
     {
         const char *const chosen = std::getenv("TAVO_CALL");
@@ -178,7 +179,7 @@ class EveryCall : public testing::TestWithParam<Family> {
         report_->descriptors = test::OpenDescriptors();
     }
 
-    // In a child that nobody traces.
+    // In a child that is not traced.
     Report MakeInChild(const Call &call, Trial::Watch watch, int failing_allocation, int &status)
     {
         *report_ = {};
@@ -198,7 +199,7 @@ class EveryCall : public testing::TestWithParam<Family> {
         return *report_;
     }
 
-    // Compares what a call came to while something failed with what it comes to when nothing does.
+    // Compares the outcome of a call with a failed step with the outcome of a healthy one.
     static void Judge(const Call &call, const Report &clean, const Report &got)
     {
         const bool same = std::strcmp(clean.text, got.text) == 0;
@@ -212,7 +213,7 @@ class EveryCall : public testing::TestWithParam<Family> {
         }
     }
 
-    // A text without what differs each time that it is written: the salts and dates of passwords.
+    // A text without the parts that differ at each writing: the salts and dates of passwords.
     static std::string Comparable(const std::string &path, const std::string &content)
     {
         if (!path.ends_with("/shadow") && !path.ends_with("/smbpasswd"))
@@ -233,7 +234,7 @@ class EveryCall : public testing::TestWithParam<Family> {
                Comparable(path, found->second.content) == Comparable(path, file.content);
     }
 
-    // Files are as they were or as they become, and nothing else has come into being.
+    // Files are as before or as after the change, and no other file has appeared.
     static void JudgeFiles(const Call &call, const KeptFiles &before, const KeptFiles &after, const KeptFiles &found,
                            bool may_leave)
     {
@@ -242,7 +243,7 @@ class EveryCall : public testing::TestWithParam<Family> {
         for (const auto &[path, file] : found) {
             if (IsPassing(path))
                 continue;
-            // What a journal that is left names is moved into place by the next program.
+            // The next program moves the files that a remaining journal names into place.
             if (path.ends_with(".tmp") && found.contains("/etc/.tavouser.commit"))
                 continue;
             if (!before.contains(path) && !after.contains(path)) {
@@ -262,7 +263,7 @@ class EveryCall : public testing::TestWithParam<Family> {
     Report *report_ = nullptr;
 };
 
-// In this process: what a checker of memory sees.
+// In this process, where a memory checker sees it.
 TEST_P(EveryCall, Once)
 {
     test::FileSnapshot files(GetParam().folders);
@@ -303,7 +304,8 @@ TEST_P(EveryCall, EachSystemCallFails)
         const std::function<void()> work = [&] {
             Make(call, Trial::Watch::system_calls);
         };
-        // Once for what is made on first use, such as the account stores; then what there is to fail.
+        // Once for everything that is created on first use, such as the account stores; then to list the steps that can
+        // fail.
         for (int round = 0; round < 2; ++round) {
             *report_ = {};
             test::SystemCallsOf(work);
@@ -332,7 +334,7 @@ TEST_P(EveryCall, EachSystemCallFails)
                 ++tried;
                 const bool database = IsOnStack(ending.stack, "libdb");
                 if (database && (ending.IsClean() || WIFSIGNALED(ending.status))) {
-                    // Berkeley DB loses descriptors, memory and itself when the system fails it.
+                    // Berkeley DB leaks descriptors and memory, or dies, when the system fails it.
                     files.Restore();
                     continue;
                 }
@@ -366,7 +368,7 @@ TEST_P(EveryCall, EachAllocationFails)
             continue;
         int status = 0;
         if (!(call.flags & every_call::kInChild)) {
-            // What the process keeps for itself is allocated here, not in each child.
+            // Memory that the process keeps is allocated here, not in each child.
             *report_ = {};
             {
                 Trial run(*report_, Trial::Watch::nothing, 0);

@@ -1,5 +1,5 @@
-// Programs that the library starts, and quotas, as the table of calls has them: answered at once, so that a call that
-// starts ten programs can be made a thousand times.
+// Stand-ins for the programs that the library starts and for quotas: they answer at once, so that a call that starts
+// ten programs can be made a thousand times.
 #include "call.h"
 
 #include "support/captures.h"

@@ -31,7 +31,7 @@ constexpr const char *kUuid = "495e879a:4e806313:a484c744:9c844bd2";
 constexpr unsigned long kArrayStatus = 0x80040961;
 constexpr unsigned long kSyncStatus = 0x80140960;
 
-// The kernel's answers. A request is made for show, so that it can be failed like every other system call.
+// The kernel's answers. A real request is made for show, so that it can be failed like every other system call.
 int Answer(int, unsigned long request, void *argument)
 {
     if (WasFailed(::syscall(SYS_ioctl, -1, request, argument)))
@@ -650,7 +650,7 @@ Family StorageFamily()
         [] { return std::make_shared<Storage>(); },
         {"/etc", "/usr/tavo/etc"},
     };
-    // Most of these functions log what went wrong and set no code.
+    // Most of these functions log the failure and set no code.
     for (Call &call : family.calls)
         call.flags |= kNoCode;
     return family;

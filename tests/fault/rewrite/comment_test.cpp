@@ -1,4 +1,4 @@
-// TLIBFileComment where its scratch file serves: on the file system of /etc/skel.
+// TLIBFileComment where its scratch file can be used: on the file system of /etc/skel.
 #include "interposed_calls.h"
 #include "support/appliance_root.h"
 #include "support/captured_log.h"
@@ -82,7 +82,7 @@ TEST_F(Comment, FailsWithTheOldTextAndNoScratchFile)
     EXPECT_THAT(log.Texts(), testing::ElementsAre(testing::MatchesRegex("file_comment:[0-9]+ Failed to sync.*")));
 }
 
-// Without the lock the scratch file cannot serve, and the rewrite goes the ordinary way.
+// Without the lock the scratch file is not used, and the file is rewritten like any other.
 TEST_F(Comment, LeavesNoScratchFileThatCannotBeLocked)
 {
     for (const int error : {EIO, ENOLCK, ENOSYS}) {
@@ -110,7 +110,7 @@ TEST_F(Comment, ADeathAnywhereLeavesOneOfTheTwoFilesAndNothingForNewHomes)
         ASSERT_TRUE(WIFEXITED(status));
         const std::string text = test::ReadFile(kFile);
         EXPECT_TRUE(text == kOldText || text == kNewText) << n << ": " << text;
-        // The next one clears up after the dead.
+        // The next call removes files of dead processes.
         Restore();
         EXPECT_EQ(TLIBFileComment(kFile, "key"), 1) << n;
         EXPECT_EQ(test::ReadFile(kFile), kNewText) << n;

@@ -24,7 +24,7 @@ int StatusOf(pid_t child)
     return status;
 }
 
-// Runs the writer in a child that dies at its n-th call; true when the child came to its end.
+// Runs the writer in a child that dies at its n-th call; true when the child reached its end.
 bool Survives(const test::Writer &writer, const std::string &path, int n)
 {
     const pid_t child = ::fork();
@@ -68,13 +68,13 @@ TEST(Death, AtEveryCallOfARewriteLeavesTheOldOrTheNewFile)
         } while (n < 100);
         EXPECT_EQ(n, 7) << writer.name << ": write, fchown, fchmod, fsync, rename, fsync of the directory, the end";
         EXPECT_EQ(seen_new, 2) << writer.name << ": after the rename";
-        // The next rewrite removes what the dead have left.
+        // The next rewrite removes the files of dead processes.
         EXPECT_EQ(TextAfter(writer, file), new_text) << writer.name;
         EXPECT_THAT(dir.Names(), testing::ElementsAre("file")) << writer.name;
     }
 }
 
-// Beside the settings file are the temporary files of other rewrites, which live, and files of other people.
+// Beside the settings file are temporary files of other, living rewrites, and files of users.
 TEST(Death, OnlyDeadTemporaryFilesOfTheSameTargetAreRemoved)
 {
     const test::ScratchDir dir;
@@ -94,7 +94,7 @@ TEST(Death, OnlyDeadTemporaryFilesOfTheSameTargetAreRemoved)
     EXPECT_EQ(test::kRewriters[0].write(other.c_str()), 1);
     EXPECT_THAT(dir.Names(), testing::UnorderedElementsAreArray(kept));
 
-    // A rewrite that is still at work: stopped at its write.
+    // A rewrite still in progress: stopped at its write.
     const pid_t child = ::fork();
     if (child == 0) {
         test::StopAtCall(1);

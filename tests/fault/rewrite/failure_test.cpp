@@ -27,7 +27,7 @@ using testing::ElementsAre;
 
 namespace {
 
-TEST(FailingCalls, GiveTheirCodes)
+TEST(FailingCalls, ReturnTheirCodes)
 {
     struct Row {
         Call call;
@@ -172,7 +172,7 @@ TEST_F(FullDisk, FailsEveryWriterAndLeavesTheOldText)
     EXPECT_EQ(TLIBFileSetKeyValue(file_.c_str(), "key", "new", nullptr), 1) << "with room it works";
 }
 
-TEST_F(FullDisk, FailsEveryAppenderAndWhateverMakesAFile)
+TEST_F(FullDisk, FailsEveryAppenderAndCreator)
 {
     Fill(0);
     const char *file = file_.c_str();

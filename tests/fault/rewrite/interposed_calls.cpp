@@ -30,7 +30,7 @@ bool Reached()
     return calls_made == die_at;
 }
 
-// Ends the process or says that the call is to fail.
+// Ends the process, or returns whether the call is to fail.
 bool Fails(Call call)
 {
     if (Reached())

@@ -6,11 +6,11 @@ namespace test {
 
 constexpr int kDied = 77;  // the exit status of a process that was ended
 
-// The n-th write, fsync, fchmod, fchown or rename from now on ends the process instead of being made; of a write, the
-// first half is made. 0: none.
+// Before the n-th write, fsync, fchmod, fchown or rename from now on the process ends; of a write, the first half is
+// made. 0: none.
 void DieAtCall(int n);
 
-// The n-th of these calls from now on stops the process (SIGSTOP) before it is made.
+// Before the n-th of these calls from now on the process stops (SIGSTOP).
 void StopAtCall(int n);
 
 // How many of these calls there were since.
@@ -21,7 +21,7 @@ enum class Call { none, fstat, write, fsync_file, fsync_directory, fchmod, fchow
 // From now on these calls fail with this errno.
 void FailCalls(Call call, int error);
 
-// The name that the last rename took away.
+// The name that the last rename removed.
 const char *RenamedFrom();
 
 // How often each was made since the last question.

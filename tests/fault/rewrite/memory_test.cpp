@@ -1,4 +1,4 @@
-// Memory that runs out at any allocation: the code says so, nothing has changed, nothing is left allocated.
+// Memory runs out at any allocation: the code reports it, nothing has changed, nothing is left allocated.
 #include "support/appliance_root.h"
 #include "support/captured_log.h"
 #include "support/descriptors.h"
@@ -20,7 +20,7 @@ using testing::ElementsAre;
 
 namespace {
 
-// Codes that mean it: a stream that finds no memory says that it could not be written.
+// Codes for it: a stream that finds no memory reports a failed write.
 const auto kNoMemory = testing::AnyOf(ERR_OUT_OF_MEMORY, ERR_WRITE_FAILED, ERR_OPEN_FAILED);
 
 TEST(OutOfMemory, LeavesTheOldText)
@@ -46,7 +46,7 @@ TEST(OutOfMemory, LeavesTheOldText)
                 EXPECT_EQ(result, 1) << writer.name;
                 continue;
             }
-            if (result == 1) {  // it did without, as a stream does that only wanted to shrink its text
+            if (result == 1) {  // it succeeded without, like a stream that only wanted to shrink its text
                 EXPECT_EQ(test::ReadFile(file), new_text) << writer.name << " allocation " << faults.Count();
                 continue;
             }
@@ -134,7 +134,7 @@ TEST(OutOfMemory, MakesNoFile)
         check(writer);
 }
 
-// What else allocates in these families. Each gives 1 when it is done.
+// Other functions of these families that allocate. Each returns 1 when it is done.
 TEST(OutOfMemory, FailsTheRest)
 {
     const test::ScratchDir dir;
@@ -191,7 +191,7 @@ TEST(OutOfMemory, FailsTheRest)
     }
     std::fclose(stream);
 
-    // This one has nothing to say, and a file that was not emptied is as it was.
+    // This one returns nothing, and a file that was not emptied is unchanged.
     test::EachAllocation faults;
     while (faults.Next()) {
         test::WriteFile(file, "text");

@@ -1,4 +1,4 @@
-// What somebody may have put where a rewrite looks: links, FIFOs, devices, directories, foreign files.
+// Traps where a rewrite looks: links, FIFOs, devices, directories, other users' files.
 #include "support/fault_state.h"
 #include "support/scratch_dir.h"
 #include "writers.h"
@@ -40,7 +40,7 @@ class Planted : public testing::Test {
         ::rmdir(kScratch);
     }
 
-    // Whatever stands at the scratch name, the key becomes a comment and the victim is as it was.
+    // Whatever is at the scratch name, the key becomes a comment and the victim is unchanged.
     void Comment(const char *what)
     {
         test::WriteFile(file_, "a=1\nkey=1\n");
@@ -88,7 +88,7 @@ TEST_F(Planted, TheScratchFileOfALivingProcessStays)
     EXPECT_NE(::access(kScratch, F_OK), 0) << "nothing is left where new homes are copied from";
 }
 
-// In /tmp a link may be somebody's trap; anywhere else it is the administrator's own.
+// In /tmp a link may be another user's trap; anywhere else it is the administrator's own.
 TEST_F(Planted, LinksInAPublicDirectoryAreNotFollowed)
 {
     const std::string open_dir = dir_ / "open";
@@ -122,7 +122,7 @@ TEST_F(Planted, LinksInAPublicDirectoryAreNotFollowed)
     EXPECT_THAT(dir_.Names(), ElementsAre("file", "link", "open", "victim"));
 }
 
-TEST_F(Planted, WhatIsNoFileIsRefusedAtOnce)
+TEST_F(Planted, RefusesSpecialFilesAtOnce)
 {
     const std::string fifo = dir_ / "fifo";
     ASSERT_EQ(::mkfifo(fifo.c_str(), 0666), 0);

@@ -1,4 +1,4 @@
-// Every function that rewrites a settings file, with what it makes of one text.
+// Every function that rewrites a settings file, with its result for one text.
 #ifndef TESTS_FAULT_REWRITE_WRITERS_H
 #define TESTS_FAULT_REWRITE_WRITERS_H
 
@@ -31,7 +31,7 @@ inline const StringHash &NewPairs()
         }                                                                                                              \
     }
 
-// Each gives 1 when it is done.
+// Each returns 1 when it is done.
 inline constexpr Writer kRewriters[] = {
     WRITER("SetKeyValue", "file_set_key_value", TLIBFileSetKeyValue(path, "key", "new", nullptr)),
     WRITER("RemoveKey", "file_remove_key", TLIBFileRemoveKey(path, "key")),
@@ -48,7 +48,7 @@ inline constexpr Writer kRewriters[] = {
     WRITER("Comment", "file_comment", TLIBFileComment(path, "key")),
 };
 
-// Each gives 1 when it is done.
+// Each returns 1 when it is done.
 inline constexpr Writer kAppenders[] = {
     WRITER("AppendKey", "file_append_key", TLIBFileAppendKey(path, "added", "v", nullptr)),
     WRITER("AddSection", "file_add_section", ErrTLIBFileAddSection(path, "added", NewPairs().Get(), nullptr) + 1),

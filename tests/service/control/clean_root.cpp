@@ -1,4 +1,4 @@
-// Puts the appliance root back after each test: where tests share one root, none finds the services of another.
+// Restores the appliance root after each test: where tests share one root, no test finds the services of another.
 #include "service_root.h"
 
 #include "support/scratch_dir.h"
@@ -12,7 +12,7 @@ namespace fs = std::filesystem;
 class CleanRoot : public testing::EmptyTestEventListener {
     void OnTestProgramStart(const testing::UnitTest &) override
     {
-        // Nowhere but in an appliance root: everything here is gone afterwards.
+        // Only in an appliance root: everything here is removed afterwards.
         inside_ = fs::exists("/usr/tavo/etc/rc.table") && fs::exists("/var/standin");
         for (auto &[path, text] : files_) {
             if (inside_)

@@ -1,4 +1,5 @@
-// Services switched for real: stand-in daemons start, write pid files and end; every script call is in /var/standin/rc.log.
+// Switches services for real: stand-in daemons start, write pid files and end; /var/standin/rc.log lists every script
+// call.
 #include "tavo_service.h"
 
 #include "service_root.h"
@@ -61,7 +62,7 @@ TEST(ServiceLookUps, RowsAndRefusals)
         EXPECT_EQ(TAVOServiceStatusGet(id), 0);
     }
 
-    // The empty row that ends the table is a row: every look-up takes it.
+    // The empty row that ends the table is a row: every look-up accepts it.
     test::ForgetFault();
     ASSERT_NE(TAVOServiceInfoGet(30), nullptr);
     EXPECT_EQ(TAVOServiceNameGet(30), nullptr);
@@ -113,14 +114,14 @@ TEST(NetService, DrivesDaemonsInItsOwnOrder)
     EXPECT_TRUE(test::Eventually([] { return TAVOServiceStatusGet(21) == 0; }));
     EXPECT_EQ(rgslckList[0].nRef, 0) << "no lock is left";
 
-    // One that fails is left out of the answer, the others are driven all the same.
+    // A daemon that fails is missing in the answer; the others are still driven.
     test::WriteFile("/var/standin/S80samba.sh.status", "3\n");
     EXPECT_EQ(TAVONetService(TAVO_DAEMON_SMB | TAVO_DAEMON_CRON, TAVO_DAEMON_START),
               static_cast<int>(TAVO_DAEMON_CRON));
     EXPECT_EQ(TAVONetService(TAVO_DAEMON_RESTORE, TAVO_DAEMON_START), 0) << "it has no command";
 }
 
-TEST(NetService, DrivesWhatTheDatabaseStackDrivesOnlyOnce)
+TEST(NetService, DrivesDaemonsOfTheDatabaseStackOnce)
 {
     const int stack = TAVO_DAEMON_DATABASE;
     EXPECT_EQ(TAVONetService(stack, TAVO_DAEMON_START), stack);
@@ -173,9 +174,9 @@ TEST(NetService, ReloadsBySignal)
     EXPECT_THAT(ScriptCalls(), IsEmpty());
 }
 
-// A pid file with anything but one number in it, or one that somebody else could have written, would make the reload
-// signal processes of others, or all of them.
-TEST(NetService, BelievesNoHostilePidFile)
+// A reload trusts no pid file with anything but one number in it, and none that another user could have written: it
+// would signal other processes, or all of them.
+TEST(NetService, IgnoresHostilePidFiles)
 {
     const struct {
         uint32_t daemon;
@@ -211,7 +212,7 @@ TEST(NetService, BelievesNoHostilePidFile)
             test::WriteFile(row.pid_file, text);
             expect_no_signal();
         }
-        // Somebody else's file, and a link to one.
+        // Another user's file, and a link to one.
         test::WriteFile(row.pid_file, other + "\n");
         ASSERT_EQ(::chown(row.pid_file, 1000, 1000), 0);
         expect_no_signal();
@@ -240,7 +241,7 @@ TEST(NetService, RefusesAndLogs)
     EXPECT_THAT(ScriptCalls(), IsEmpty());
 }
 
-// Start scripts run under the dispatcher's locks: one that wants them waits for its own time-out, and no longer.
+// Start scripts run under the dispatcher's locks: one that takes them waits for its own time-out, and no longer.
 TEST(NetService, ScriptThatLocksFailsInTime)
 {
     test::WriteFile("/var/standin/S04crond.sh.hook", "#!/bin/sh\nexec tavoctl service status samba\n", 0755);
@@ -310,7 +311,7 @@ TEST_F(Services, DataFoldersAreBoundInOrderAndNamedByTheirRule)
     EXPECT_EQ(TAVOServiceVolumeGetbyShare("nobody", volume, sizeof volume), 0);
     EXPECT_EQ(LastFault(), (Fault{ERR_NO_SUCH_SHARE, "service_volume_getby_share"}));
 
-    // Photos are still wanted by the media server: disabling the photo service leaves them bound.
+    // The media server still needs the photos: disabling the photo service leaves them bound.
     ASSERT_EQ(TAVOServiceActionSet(1, TAVO_SERVICE_ENABLE), 0);
     ASSERT_EQ(TAVOServiceActionSet(1, TAVO_SERVICE_DISABLE), 0);
     EXPECT_EQ(LinkTarget("/var/services/photo"), "/volume2/photo");
@@ -328,8 +329,8 @@ TEST_F(Services, FoldersAreBoundInOrderBeforeTheServerStarts)
               "[music]\n[video]\n[photo]\n/volume2/music\n/volume2/video\n/volume2/photo\n");
 }
 
-// What fails is told in one line, and nothing after it is done.
-TEST_F(Services, EachStepOfAnActionThatFailsIsTold)
+// A failure is logged in one line and ends the action.
+TEST_F(Services, LogsEachFailedStepOfAnAction)
 {
     const auto expect = [&](int code, const char *text) {
         EXPECT_EQ(TLIBErrGet(), code) << text;
@@ -346,7 +347,7 @@ TEST_F(Services, EachStepOfAnActionThatFailsIsTold)
     EXPECT_EQ(Setting("runweb"), "no");
     std::filesystem::remove("/volume2/web");
 
-    // The daemon fails when the key is written already.
+    // The daemon fails after the key has been written.
     test::WriteFile("/var/standin/S97apache-user.sh.status", "3\n");
     EXPECT_EQ(TAVOServiceActionSet(0, TAVO_SERVICE_ENABLE), -1);
     expect(ERR_SERVICE_STD_ACTION, "TAVONetService failed with id=64");
@@ -399,7 +400,7 @@ TEST_F(Services, TheOldVolumeIsKeptAndAFullDeskHasNone)
     EXPECT_THAT(ScriptCalls(), IsEmpty());
 }
 
-// A folder at the place of a volume that is not mounted is on the system's disk.
+// A folder at the path of an unmounted volume is on the system's disk.
 TEST_F(Services, AnUnmountedVolumeIsNeverChosenAndIsLoggedWhenNamed)
 {
     std::filesystem::create_directory("/volume7");
@@ -441,7 +442,7 @@ TEST_F(Services, AVolumeGoesAndComesBack)
     EXPECT_TRUE(std::filesystem::exists("/volume2/web"));
 }
 
-// A share that was not recorded yet is added; a caller that looks at the code after a success finds its own.
+// A share that was not recorded yet is added. After a success the error state still holds the caller's own code.
 TEST_F(Services, SuccessLeavesTheErrorStateAlone)
 {
     for (const int id : {0, 1, 3, 7, 8, 10, 11}) {
@@ -451,7 +452,7 @@ TEST_F(Services, SuccessLeavesTheErrorStateAlone)
     }
 }
 
-// A process that has ended keeps its pid until its parent asks for the status: it is not a running daemon.
+// A zombie keeps its pid until its parent asks for the status: it is not a running daemon.
 TEST(ServiceStatus, DoesNotCountTheDead)
 {
     if (test::RootLacks("proc"))
@@ -469,8 +470,8 @@ TEST(ServiceStatus, DoesNotCountTheDead)
     EXPECT_EQ(::waitpid(daemon, nullptr, 0), daemon);
 }
 
-// The links' folder is open to everybody on some appliances: what stands in a link's place may be a trap.
-TEST_F(Services, NothingButALinkIsReplaced)
+// The links' folder is open to everybody on some appliances: a file in place of a link may be a trap.
+TEST_F(Services, OnlyALinkIsReplaced)
 {
     std::filesystem::create_directories("/var/services");
     ASSERT_EQ(::mkdir("/var/services/web", 0755), 0);
@@ -519,7 +520,7 @@ TEST_F(Services, SharedFoldersAreReleasedByTheLast)
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_removeby_info"}));
 }
 
-TEST_F(Services, TheRecordSaysWhatTheModelHasAndWhereTheFolderIs)
+TEST_F(Services, TheRecordHasTheCapabilityAndTheFolder)
 {
     const struct {
         int id;
@@ -529,7 +530,7 @@ TEST_F(Services, TheRecordSaysWhatTheModelHasAndWhereTheFolderIs)
         {1, "supportweb", "YES", 1},
         {1, "supportweb", "no", 0},
         {1, "supportweb", "yes, very much", 0},
-        {3, "netbkp", "yes", 1},  // no "support" in front of this one
+        {3, "netbkp", "yes", 1},  // this key has no "support" prefix
         {9, "supportsurveillance", "no", 0},
     };
     TAVOSERVICESHARE share;
@@ -538,7 +539,7 @@ TEST_F(Services, TheRecordSaysWhatTheModelHasAndWhereTheFolderIs)
         ASSERT_EQ(TAVOServiceSettingGet(row.id, &share), 0);
         EXPECT_EQ(share.fSupported, row.supported) << row.key << "=" << row.value;
     }
-    // Any one of a folder's keys will do; some folders need none.
+    // Any one of a folder's keys is enough; some folders need none.
     for (const char *key : {"supportmediaservice", "support_audio", "supportitunes"})
         ASSERT_EQ(TLIBFileSetKeyValue("/etc.defaults/tavoinfo.conf", key, "no", nullptr), 1);
     TAVOServiceSettingGet(6, &share);
@@ -551,7 +552,7 @@ TEST_F(Services, TheRecordSaysWhatTheModelHasAndWhereTheFolderIs)
         EXPECT_EQ(share.fSupported, 1) << id;
     }
 
-    // A link to no volume is told in the log and is no failure; one to a remote volume is special.
+    // A link that leads outside the volumes is logged and not a failure; one to a remote volume is special.
     ASSERT_EQ(TAVOServiceLinkSet(1, "/nowhere/web"), 0);
     log_.Clear();
     TLIBErrSet(ERR_OPEN_FAILED);
@@ -578,7 +579,7 @@ TEST_F(Services, TheRecordSaysWhatTheModelHasAndWhereTheFolderIs)
     EXPECT_EQ(TAVOServiceSettingGet(1, nullptr), -1);
 }
 
-TEST_F(Services, UserHomesAreMadeForEverybodyAndLeftAlone)
+TEST_F(Services, UserHomesAreCreatedOnceForEveryUser)
 {
     ASSERT_EQ(::mkdir("/volume2/homes", 0755), 0);
     test::WriteFile("/volume2/homes/guest", "no folder");
@@ -594,7 +595,7 @@ TEST_F(Services, UserHomesAreMadeForEverybodyAndLeftAlone)
     EXPECT_EQ(test::ReadFile("/var/services/homes/admin/diary"), "x");
 }
 
-TEST_F(Services, TheLinksFolderIsMadeWhereItIsMissing)
+TEST_F(Services, AMissingLinkFolderIsCreated)
 {
     std::filesystem::remove_all("/var/services");
     ::umask(022);
@@ -604,7 +605,7 @@ TEST_F(Services, TheLinksFolderIsMadeWhereItIsMissing)
     ASSERT_EQ(::stat("/var/services", &st), 0);
     EXPECT_EQ(st.st_mode & 07777, 0755u);
 
-    // What is no directory goes; a link to one is one.
+    // Anything but a directory is replaced; a link to a directory counts as one.
     std::filesystem::remove_all("/var/services");
     test::WriteFile("/var/services", "a file");
     ASSERT_EQ(TAVOServiceLinkSet(1, "/volume1/web"), 0);
@@ -641,8 +642,8 @@ TEST_F(Services, TheLinksFolderIsMadeWhereItIsMissing)
                 testing::MatchesRegex("service_link_set\\([0-9]+\\)\\[D00\\] Failed to get service info : id = 12"));
 }
 
-// A status asks the settings for a plain "no"; anything else, and no answer at all, is a yes.
-TEST(ServiceSTDStatus, CountsAsEnabledUnlessItSaysNo)
+// A status asks the settings for a plain "no"; any other value, or none, is a yes.
+TEST(ServiceSTDStatus, IsEnabledUnlessTheKeySaysNo)
 {
     const struct {
         const char *value;
@@ -663,7 +664,7 @@ TEST(ServiceSTDStatus, CountsAsEnabledUnlessItSaysNo)
     EXPECT_EQ(TAVOServiceSTDStatus(TAVOServiceInfoGet(30)), 0);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_std_status"}));
 
-    // Under somebody else's lock nobody knows.
+    // While another program holds the lock, the answer is unknown.
     const pid_t holder = ::fork();
     if (holder == 0) {
         ErrTLIBFileCloseLock();
@@ -734,7 +735,7 @@ TEST(ServiceEnableGet, TakesYesInAnyCase)
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_enable_get"}));
     EXPECT_EQ(TAVOServiceEnableGet(8), 0) << "the spooler has no key";
 
-    // The download scheduler keeps its own settings.
+    // The download scheduler has its own settings.
     test::CapturedLog log;
     ASSERT_EQ(TLIBFileSetKeyValue("/etc/tavoinfo.conf", "download_enabled", "yes", nullptr), 1);
     EXPECT_EQ(TAVOServiceEnableGet(4), 0);

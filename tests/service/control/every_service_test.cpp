@@ -1,5 +1,5 @@
-// Every service through every action, and with daemons that behave in every way: the key, the links, the share records,
-// the scripts in their order and the processes are what they must be.
+// Every service through every action, and with daemons that misbehave in every way: checks the key, the links, the
+// share records, the scripts in their order and the processes.
 #include "tavo_service.h"
 
 #include "service_root.h"
@@ -32,16 +32,16 @@ namespace {
 
 using Texts = std::vector<std::string>;
 
-// What an action of a service comes to when one of its daemons does not do as it is told.
+// Expected result of an action when a daemon misbehaves.
 enum Outcome { done = 0, failed = -1 };
 
 struct Row {
     int id;
     Texts start, stop, restart;  // the scripts that run
     Texts daemons;               // that run when it is started
-    Texts staying;               // and those of them that a stop leaves; also others that it starts
+    Texts staying;               // and those that a stop leaves running; also others that it starts
     bool on_when_stopped;        // the status of a service that is enabled and stopped
-    const char *daemon;          // the one that misbehaves; NULL: there is none
+    const char *daemon;          // the misbehaving one; NULL: there is none
     Outcome dies, stubborn;      // starting when it dies at once; stopping when it does not end
     bool has_pid_file;           // the status looks there
 };
@@ -75,7 +75,7 @@ Row Plain(int id, const std::string &script, const char *daemon, Outcome failure
             has_pid_file};
 }
 
-// One that is its key and its data folder alone.
+// A service that is only its key and its data folder.
 Row Bare(int id)
 {
     return {id, {}, {}, {}, {}, {}, true, nullptr, done, done, false};
@@ -95,7 +95,7 @@ Texts Joined(Texts left, const Texts &right)
 
 const Texts on_database = {"S82surveillance", "S99iTunes", "S86tavodms", "S66tavoindexd", "S25download", "S23tavologd"};
 
-// Scripts of a service without daemon bits: only one that could not be run is a failure.
+// Scripts of a service without daemon bits: a failure only if the script could not be run.
 const Row rows[] = {
     Plain(0, "S97apache-user", "httpd-user", failed, true),
     Bare(1),
@@ -110,7 +110,7 @@ const Row rows[] = {
      {"tavoindexd"},
      false,
      "tavoaudiod",
-     done,  // the other of its two daemons is there
+     done,  // the other of its two daemons is running
      done,
      true},
     {6,
@@ -133,7 +133,7 @@ const Row rows[] = {
      {"S82surveillance.sh restart"},
      {"ssd"},
      {},
-     true,  // nothing says which process it is
+     true,  // no record says which process it is
      "ssd",
      failed,
      failed,
@@ -240,7 +240,7 @@ class Every : public test::Services, public testing::WithParamInterface<Row> {
 
     int Act(int action) const { return TAVOServiceActionSet(row.id, action); }
 
-    // The stack of databases is several services and no one's status.
+    // The stack of databases is several services and has no status of its own.
     bool IsOn() const { return row.id == kDatabases || IsUp(row.id); }
 
     void ExpectBound(bool bound) const
@@ -410,7 +410,7 @@ TEST_P(WithDaemon, DoesNotEnd)
     EXPECT_TRUE(IsOn()) << "so it is still on";
 }
 
-// A pid file that says nothing of the daemon, whatever it says, is none.
+// A pid file that does not name the daemon, whatever it contains, counts as none.
 TEST_P(WithPidFile, HasAPidFileThatIsNotItsOwn)
 {
     for (const char *mode : {"garbage", "stale", "nopid"}) {

@@ -32,9 +32,9 @@ std::vector<std::string> NamesOnVolume(const char *volume)
     return test::Items(list.get());
 }
 
-TEST_F(Services, SwitchedAllTogetherAreThoseThatAreEnabled)
+TEST_F(Services, AreSwitchedTogetherWhenEnabled)
 {
-    // As the appliance comes: the database server, Windows sharing and the file page.
+    // Enabled on a new appliance: the database server, Windows sharing and the file page.
     ASSERT_EQ(TAVOServiceActionSet(12, TAVO_SERVICE_KEY_YES), 0);
     ScriptCalls();
     EXPECT_EQ(TAVOServiceOnOffALL(1), 4);
@@ -82,7 +82,7 @@ TEST_F(Services, AreListedByVolumeAndReleasedWithIt)
     EXPECT_EQ(test::ReadFile("/volume2/web/index.html"), "x");
     EXPECT_EQ(test::ReadFile("/usr/tavo/etc/share.conf"), "");
 
-    // One that cannot be released keeps no other.
+    // A service that cannot be released does not stop the others.
     ASSERT_EQ(TAVOServiceSet(1, "/volume2"), 0);
     ASSERT_EQ(TAVOServiceSet(2, "/volume2"), 0);
     std::filesystem::remove("/var/services/web");
@@ -114,7 +114,7 @@ TEST_F(Services, ChangeTheirVolumeAndFindAnother)
     EXPECT_EQ(TAVOServiceShareUpdate(1, "/volume2"), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_NO_SUCH_SHARE, "service_share_update"}));
 
-    // A volume is lost: those that have lost a folder are enabled again on what is left, the others go on.
+    // A volume is lost: services that have lost a folder are enabled again on the volumes left, the others go on.
     ASSERT_EQ(::umount2("/volume1", MNT_DETACH), 0);
     ScriptCalls();
     EXPECT_EQ(TAVOServiceRestartfromVolumeNone(), 2) << "pgsql, which never had a folder, and media; audio follows";

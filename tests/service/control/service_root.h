@@ -52,13 +52,13 @@ inline std::string Setting(const char *key)
     return TLIBFileGetKeyValue("/etc/tavoinfo.conf", key, value, sizeof value, 0) > 0 ? value : "(none)";
 }
 
-// Daemons come and go a moment after their scripts have ended.
+// Daemons start and end a moment after their scripts have ended.
 inline bool IsUp(int service)
 {
     return Eventually([&] { return TAVOServiceStatusGet(service) == 1; });
 }
 
-// The process of a stand-in, whatever its pid file says; 0 when it does not run.
+// Returns the process of a stand-in, whatever its pid file says; 0 when it does not run.
 inline pid_t DaemonPid(const std::string &name)
 {
     pid_t pid = 0;
@@ -82,7 +82,7 @@ inline std::string LinkTarget(const char *link)
     return std::filesystem::read_symlink(link, none);
 }
 
-// Ends every stand-in, however stubborn, and forgets what they were told.
+// Ends every stand-in, even a stubborn one, and removes its modes.
 inline void ResetStandins()
 {
     std::error_code none;

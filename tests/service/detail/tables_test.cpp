@@ -1,4 +1,4 @@
-// The tables of the services, the page that prints them, and what is read from the kernel for them.
+// The tables of the services, the page that prints them, and the parsers of the kernel's lists.
 #include "service/detail/process_named.h"
 #include "service/detail/service_table.h"
 #include "service/detail/volume_list.h"

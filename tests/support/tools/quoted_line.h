@@ -1,5 +1,5 @@
-// One argument vector as one line of text, reversible and readable: plain words stand as they are, any other is written
-// as the shell's $'...'. Two vectors are equal when their lines are.
+// One argument vector as one line of text, reversible and readable: plain words are unchanged, any other is written as
+// the shell's $'...'. Two vectors are equal when their lines are.
 #ifndef TESTS_SUPPORT_TOOLS_QUOTED_LINE_H
 #define TESTS_SUPPORT_TOOLS_QUOTED_LINE_H
 

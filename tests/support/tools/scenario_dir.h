@@ -1,12 +1,12 @@
 // The folder through which a test and the scripted tools talk: what is expected, in order, and what was called.
-//   /var/scenario/calls/NNN/line    the expected call as one quoted line; "TOOL ..." stands for any arguments
+//   /var/scenario/calls/NNN/line    the expected call as one quoted line; "TOOL ..." means any arguments
 //                           stdout  printed as it is; stderr likewise
 //                           status  the exit status in decimal, or "signal N"; 0 without this file
 //                           times   how often: a number, or "any" for never, once or often, at any moment; default 1
 //                           run     a program that is run first with the call's arguments
 //                           seen    written by the tool: how often it was called
 //   /var/scenario/order   "any" when the calls may come in any order
-//   /var/scenario/log     one line a call: NNN and the call, "-" and the call when nobody expected it, "~" and the call
+//   /var/scenario/log     one line per call: NNN and the call, "-" and the call when it was not expected, "~" and the call
 //                         when there is no scenario and the userland's own tool of that name ran
 #ifndef TESTS_SUPPORT_TOOLS_SCENARIO_DIR_H
 #define TESTS_SUPPORT_TOOLS_SCENARIO_DIR_H

@@ -1,6 +1,6 @@
-// Takes the place of every tool that a test scripts (mdadm, pvs, ifconfig, ...): writes its argument vector down,
-// prints what the scenario says and ends as the scenario says. Called as "scenario" it is the shell's way to set up a
-// scenario and to ask how it went.
+// Takes the place of every tool that a test scripts (mdadm, pvs, ifconfig, ...): writes down its argument vector,
+// prints what the scenario prescribes and ends with the prescribed status. Called as "scenario" it is the shell's
+// interface to create a scenario and to ask for its result.
 #include "quoted_line.h"
 #include "scenario_dir.h"
 
