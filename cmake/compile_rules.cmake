@@ -2,7 +2,7 @@
 
 add_library(tavo_rules INTERFACE)
 
-# 32-bit ARM has 32-bit time_t and off_t unless told otherwise; a volume is larger and the year 2038 nearer than that.
+# 32-bit ARM has 32-bit time_t and off_t by default; volumes are larger, and the year 2038 is near.
 target_compile_definitions(tavo_rules INTERFACE _GNU_SOURCE _FILE_OFFSET_BITS=64 _TIME_BITS=64)
 
 target_compile_options(tavo_rules INTERFACE

@@ -10,7 +10,7 @@ include(CMakePackageConfigHelpers)
 
 install(TARGETS tavosdk EXPORT tavosdkTargets
     LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT runtime NAMELINK_COMPONENT development)
-# The library's own, for nobody to link: it loads what is in there when it is first needed.
+# Private to the library, which loads it on first use; programs do not link it.
 install(TARGETS tavosdk_extras LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/tavosdk COMPONENT runtime)
 # Keeps the cleaner of /tmp away from the lock files.
 install(FILES ${PROJECT_SOURCE_DIR}/cmake/tavosdk-tmpfiles.conf

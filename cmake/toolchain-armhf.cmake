@@ -29,7 +29,7 @@ set(ENV{PKG_CONFIG_DIR} "")
 set(ENV{PKG_CONFIG_SYSROOT_DIR} ${TAVO_SYSROOT})
 set(ENV{PKG_CONFIG_LIBDIR} ${TAVO_SYSROOT}/usr/lib/arm-linux-gnueabihf/pkgconfig:${TAVO_SYSROOT}/usr/share/pkgconfig)
 
-# 32-bit ARM has 32-bit time_t and off_t unless told otherwise; all of its code is told, not only the library's.
+# 32-bit ARM has 32-bit time_t and off_t by default; this changes it for all code, not only for the library.
 set(CMAKE_C_FLAGS_INIT "-D_FILE_OFFSET_BITS=64 -D_TIME_BITS=64")
 set(CMAKE_CXX_FLAGS_INIT "-D_FILE_OFFSET_BITS=64 -D_TIME_BITS=64")
 

@@ -13,7 +13,8 @@ namespace {
 // The locks of the settings file, of Samba and of the Apple files, exclusively, because start scripts write these
 // files. So a start script must not call a function that takes one of these locks: it would wait for its time-out and
 // fail.
-constexpr unsigned kServiceLock = 0x1846;
+constexpr unsigned kServiceLock =
+    TAVO_LOCK_TAVOINFO | TAVO_LOCK_SMB | TAVO_LOCK_APPLE | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING;
 constexpr int kLockSeconds = 5;
 
 constexpr uint32_t kBothWebs = TAVO_DAEMON_WEB_USER | TAVO_DAEMON_WEB_SYSTEM;

@@ -16,7 +16,7 @@
 
 namespace {
 
-constexpr unsigned kSettingsLock = 0x800;
+constexpr unsigned kSettingsLock = TAVO_LOCK_TAVOINFO;
 constexpr int kLockSeconds = 5;
 
 enum class Enabled { no, yes, unknown };
@@ -32,7 +32,7 @@ Enabled IsEnabled(const char *key)
 {
     if (!key)
         return Enabled::yes;
-    if (ErrTLIBFileLock(kSettingsLock | 5, kLockSeconds) != 0)
+    if (ErrTLIBFileLock(kSettingsLock | TAVO_LOCK_SHARED | TAVO_LOCK_NONBLOCKING, kLockSeconds) != 0)
         return Enabled::unknown;
     const bool no = IsNo(key);
     if (ErrTLIBFileUnlock(kSettingsLock) != 0)

@@ -17,7 +17,7 @@ extern "C" int TAVOConfSetMTUValue(const char *szInterface, int mtu)
         LogError("%s:%d interface name is too long");
         return Fail(ERR_BAD_PARAMETERS);
     }
-    const tavo::LockHold lock(0x806, 5);
+    const tavo::LockHold lock(TAVO_LOCK_TAVOINFO | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING, 5);
     if (!lock) {
         LogError("%s (%d) Failed to lock tavoinfo(%X)", TLIBErrGet());
         return Fail(ERR_LOCK_FAILED);

@@ -31,7 +31,7 @@ int TellPanel()
 // 0 or a code. The card forgets when the power goes, so that the start-up scripts need the options, too.
 int Store(const char *interface, const std::string &options)
 {
-    const tavo::LockHold lock(0x806, 5);
+    const tavo::LockHold lock(TAVO_LOCK_TAVOINFO | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING, 5);
     if (!lock) {
         LogError("%s (%d) Failed to lock tavoinfo(%X)", TLIBErrGet());
         return ERR_LOCK_FAILED;

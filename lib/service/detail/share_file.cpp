@@ -17,7 +17,8 @@ namespace tavo {
 namespace {
 
 constexpr const char *kShares = "/usr/tavo/etc/share.conf";
-constexpr unsigned kSharesLock = 0x40 | 6;  // Samba's lock: its configuration is made from the shares
+// Samba's lock, because its configuration is made from the shares.
+constexpr unsigned kSharesLock = TAVO_LOCK_SMB | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING;
 constexpr int kLockSeconds = 5;
 constexpr int kHashBytes = 512;
 
