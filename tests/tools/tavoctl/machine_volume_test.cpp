@@ -3,6 +3,7 @@
 #include "run_tavoctl.h"
 
 #include "support/machine.h"
+#include "support/scratch_dir.h"
 
 #include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
@@ -162,6 +163,31 @@ TEST_F(MachineVolumes, WhatCannotBeStartedSafelyIsSaidAndForcedOnRequest)
     EXPECT_EQ(Tavoctl({"raid", "assemble", "--yes", "--force", "md2"}).status, 0);
     EXPECT_EQ(Facts({"raid", "list", "--json"}).at(0).at("status"), "degraded");
     EXPECT_EQ(Told("head -c 1M /dev/md2 | wc -c"), "1048576\n");
+}
+
+TEST_F(MachineVolumes, WatchTellsOfDisksAndArrays)
+{
+    const std::string pid = Told("tavoctl watch --json >/tmp/watched 2>&1 & echo $! && sleep 3");
+    Does({"raid", "create", "--yes", "--level", "1", "--no-sync", "md4", "sda", "sdb"});
+    test::Happen("pull 2");
+    Told("dd if=/dev/urandom of=/dev/md4 bs=64k count=1 oflag=direct");
+    EXPECT_TRUE(test::Comes([] { return Facts({"raid", "list", "--json"}).at(0).at("status") == "degraded"; }));
+    test::Happen("plug 2 --blank");
+    Does({"raid", "replace", "--yes", "--wait", "md4", DiskInBay("2")});
+    const char *const expected[] = {
+        R"("event":"array-started","object":"md4")",
+        R"("event":"disk-out","object":"sdb","detail":"bay 2")",
+        R"("event":"member-failed","object":"md4","detail":"/dev/sdb")",
+        R"("event":"array-degraded","object":"md4")",
+        R"("event":"disk-in","object":"sdg","detail":"bay 2")",
+        R"("event":"member-added","object":"md4","detail":"/dev/sdg")",
+        R"("event":"rebuild-begun","object":"md4","detail":"recover")",
+        R"("event":"array-normal","object":"md4")",
+    };
+    for (const char *text : expected)
+        EXPECT_TRUE(test::Comes([&] { return test::ReadFile("/tmp/watched").find(text) != std::string::npos; }))
+            << text << test::ReadFile("/tmp/watched");
+    Told("kill " + pid);
 }
 
 }  // namespace

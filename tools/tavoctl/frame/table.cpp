@@ -278,12 +278,12 @@ std::string Record::Text() const
     return grid.Text();
 }
 
-std::string Record::Json() const
+std::string Record::Json(bool one_line) const
 {
     nlohmann::ordered_json document = NewDocument();
     for (const auto &[name, value] : fields_)
         document[name] = ToJson(value);
-    return Dump(document);
+    return Dump(document, one_line);
 }
 
 std::string ChangeReport::Text() const

@@ -50,8 +50,8 @@ class Record {
 
     void Add(std::string name, Cell value);
 
-    std::string Text() const;  // a field a line
-    std::string Json() const;  // an object
+    std::string Text() const;                       // a field a line
+    std::string Json(bool one_line = false) const;  // an object
 
   private:
     std::vector<std::pair<std::string, Cell>> fields_;

@@ -1,0 +1,91 @@
+// tavoctl watch where the kernel is this machine's: mounts, links, addresses and services of a root of its own.
+#include "run_tavoctl.h"
+
+#include "support/appliance_root.h"
+#include "support/eventually.h"
+#include "support/machine.h"
+#include "support/scratch_dir.h"
+
+#include <gmock/gmock.h>
+#include <nlohmann/json.hpp>
+
+#include <filesystem>
+
+namespace {
+
+using nlohmann::json;
+using test::Shell;
+
+// Runs the watch with its output in a file until it is told to end.
+class Watching {
+  public:
+    explicit Watching(const std::string &options = {})
+    {
+        std::filesystem::remove(place);
+        pid_ = std::stoi(test::Told("tavoctl watch --json " + options + " >" + place + " 2>&1 & echo $!"));
+        ::usleep(500'000);
+    }
+    ~Watching() { Shell("kill " + std::to_string(pid_)); }
+
+    bool Tells(const char *event, const std::string &object, const std::string &detail = "") const
+    {
+        return test::Eventually([&] {
+            std::istringstream lines(test::ReadFile(place));
+            for (std::string line; std::getline(lines, line);) {
+                const json facts = json::parse(line, nullptr, false);
+                if (facts.is_object() && facts.at("event") == event && facts.at("object") == object &&
+                    facts.value("detail", json()).dump().find(detail) != std::string::npos)
+                    return true;
+            }
+            return false;
+        });
+    }
+
+    static constexpr char place[] = "/tmp/watched";
+
+  private:
+    int pid_;
+};
+
+TEST(TavoctlWatch, TellsOfMountsServicesLinksAndAddresses)
+{
+    if (test::RootLacks("mount") || test::RootLacks("net"))
+        GTEST_SKIP() << "nothing may be mounted here";
+    const Watching watching;
+    test::Told("mkdir -p /volume7 && mount -t tmpfs room /volume7");
+    EXPECT_TRUE(watching.Tells("volume-mounted", "/volume7", "room"));
+    test::Told("umount /volume7");
+    EXPECT_TRUE(watching.Tells("volume-unmounted", "/volume7"));
+
+    test::Told("tavoctl service start crond");
+    EXPECT_TRUE(watching.Tells("service-up", "crond", "pid "));
+    test::Told("tavoctl service stop crond");
+    EXPECT_TRUE(watching.Tells("service-down", "crond")) << test::ReadFile(Watching::place);
+    // One that dies at once leaves its pid file behind.
+    test::Told(": >/tmp/watched; tavoctl service start crond && kill -9 $(tavoctl service list --noheadings --output "
+               "name,pid | awk '$1 == \"crond\" { print $2 }')");
+    EXPECT_TRUE(watching.Tells("service-down", "crond")) << test::ReadFile(Watching::place);
+
+    test::Told("ip link set lo up && ip addr add 10.9.8.7/24 dev lo");
+    EXPECT_TRUE(watching.Tells("address-added", "lo", "10.9.8.7/24"));
+    test::Told("ip addr del 10.9.8.7/24 dev lo");
+    EXPECT_TRUE(watching.Tells("address-removed", "lo", "10.9.8.7/24"));
+}
+
+TEST(TavoctlWatch, RunsAProgramForEachEvent)
+{
+    if (test::RootLacks("mount"))
+        GTEST_SKIP() << "nothing may be mounted here";
+    test::WriteFile("/tmp/tell", "#!/bin/sh\necho \"$1,$2,$3\" >>/tmp/heard\n");
+    test::Told("chmod 755 /tmp/tell");
+    const Watching watching("--exec /tmp/tell");
+    test::Told("mkdir -p /volume8 && mount -t tmpfs room /volume8");
+    EXPECT_TRUE(watching.Tells("volume-mounted", "/volume8"));
+    EXPECT_TRUE(test::Eventually([] {
+        return std::filesystem::exists("/tmp/heard") &&
+               test::ReadFile("/tmp/heard") == "volume-mounted,/volume8,room\n";
+    }));
+    test::Told("umount /volume8");
+}
+
+}  // namespace

@@ -1,0 +1,107 @@
+// Events of services: their pid files come and go, and their processes end.
+#include "events/event.h"
+#include "frame/failure.h"
+#include "service/service_state.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <map>
+#include <set>
+
+#include <sys/inotify.h>
+#include <sys/syscall.h>
+#include <unistd.h>
+
+namespace tavoctl {
+namespace {
+
+// Tells by poll when a process ends.
+class ProcessEnd {
+  public:
+    explicit ProcessEnd(pid_t pid) : fd_(static_cast<int>(::syscall(SYS_pidfd_open, pid, 0))) {}
+    ~ProcessEnd()
+    {
+        if (fd_ >= 0)
+            ::close(fd_);
+    }
+    ProcessEnd(const ProcessEnd &) = delete;
+    ProcessEnd &operator=(const ProcessEnd &) = delete;
+    int Get() const { return fd_; }
+
+  private:
+    int fd_;
+};
+
+class ServiceSource : public EventSource {
+  public:
+    ServiceSource() : fd_(::inotify_init1(IN_CLOEXEC | IN_NONBLOCK))
+    {
+        if (fd_ < 0)
+            throw SystemFailure("watch the services", errno);
+        for (int id = 0; TAVOServiceNameGet(id); ++id) {
+            const char *proc = TAVOServiceProcGet(id);
+            const std::string path = proc ? proc : "";
+            if (const std::size_t slash = path.rfind('/'); slash != path.npos && slash > 0)
+                ::inotify_add_watch(fd_, path.substr(0, slash).c_str(),
+                                    IN_CREATE | IN_DELETE | IN_CLOSE_WRITE | IN_MOVED_TO | IN_MOVED_FROM);
+        }
+        Read();
+    }
+    ~ServiceSource() override { ::close(fd_); }
+
+    std::vector<pollfd> Wanted() const override
+    {
+        std::vector<pollfd> wanted = {{fd_, POLLIN, 0}};
+        for (const auto &[name, end] : ends_)
+            if (end->Get() >= 0)
+                wanted.push_back({end->Get(), POLLIN, 0});
+        return wanted;
+    }
+
+    void Look(std::vector<Event> &events) override
+    {
+        char bytes[4096];
+        while (::read(fd_, bytes, sizeof bytes) > 0)
+            ;
+        const std::map<std::string, pid_t> before = running_;
+        Read();
+        for (const auto &[name, pid] : before)
+            if (!running_.contains(name))
+                events.push_back({"service-down", name, ""});
+        for (const auto &[name, pid] : running_)
+            if (!before.contains(name))
+                events.push_back({"service-up", name, "pid " + std::to_string(pid)});
+            else if (before.at(name) != pid)
+                events.push_back({"service-restarted", name, "pid " + std::to_string(pid)});
+    }
+
+  private:
+    void Read()
+    {
+        std::map<std::string, pid_t> now;
+        for (int id = 0; TAVOServiceNameGet(id); ++id)
+            if (const ServiceState state = StateOf(id, false); state.pid > 0)
+                now[state.name] = state.pid;
+        std::erase_if(ends_, [&](const auto &end) {
+            const auto found = now.find(end.first);
+            return found == now.end() || running_[end.first] != found->second;
+        });
+        running_ = std::move(now);
+        for (const auto &[name, pid] : running_)
+            if (!ends_.contains(name))
+                ends_[name] = std::make_unique<ProcessEnd>(pid);
+    }
+
+    int fd_;
+    std::map<std::string, pid_t> running_;
+    std::map<std::string, std::unique_ptr<ProcessEnd>> ends_;
+};
+
+}  // namespace
+
+Source ServiceEvents()
+{
+    return std::make_unique<ServiceSource>();
+}
+
+}  // namespace tavoctl
