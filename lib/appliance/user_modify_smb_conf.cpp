@@ -49,7 +49,7 @@ extern "C" int TAVOUserModifySmbConf(const TLIBSZHASH *pshNames)
             });
         if (changed == text)
             return 0;
-        const int code = file.Replace(changed);
+        const tavo::Code code = file.Replace(changed);
         return code == 0 ? 0 : Fail(code);
     });
 }

@@ -1,10 +1,15 @@
 // Checks whether the service that owns a data folder is enabled.
 #include "tavo_service.h"
 
+#include "tavo_file.h"
+
 #include "core/detail/fault.h"
+#include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
+#include "core/detail/setting_switch.h"
 #include "service/detail/service_table.h"
-#include "service/detail/settings_files.h"
+
+#include <strings.h>
 
 namespace {
 
@@ -34,7 +39,7 @@ extern "C" int TAVOServiceEnableGet(int idShare)
     if (!row)
         return FailZero(ERR_BAD_PARAMETERS);
     if (idShare != kDownload)
-        return row->share.szEnableKey[0] && tavo::SettingIs(tavo::kSettings, row->share.szEnableKey, "yes");
+        return row->share.szEnableKey[0] && tavo::SettingSaysYes(tavo::kSettings, row->share.szEnableKey);
 
     const DownloadSetting setting(row->share.szEnableKey);
     if (setting.code != ERR_SUCCESS) {

@@ -64,7 +64,7 @@ extern "C" int TAVOServiceNewVolumeDecide(int idShare, char *szVolume, int cbVol
         if (number == 0)
             number = RoomiestVolume(mounted);
         if (number == 0)
-            return static_cast<int>(FailZero(ERR_NO_SERVICE_VOLUME));
+            return FailNone(ERR_NO_SERVICE_VOLUME);
         const std::string path = "/volume" + std::to_string(number);
         if (path.size() >= static_cast<size_t>(cbVolume))
             return Fail(ERR_BAD_PARAMETERS);

@@ -3,7 +3,7 @@
 
 #include "core/detail/fault.h"
 #include "service/detail/service_table.h"
-#include "service/detail/settings_files.h"
+#include "service/detail/switched_on.h"
 
 #include <algorithm>
 #include <string_view>

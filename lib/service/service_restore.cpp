@@ -5,7 +5,7 @@
 #include "core/detail/log.h"
 #include "service/detail/data_folder.h"
 #include "service/detail/service_table.h"
-#include "service/detail/settings_files.h"
+#include "service/detail/switched_on.h"
 #include "service/detail/volume_list.h"
 
 #include <climits>

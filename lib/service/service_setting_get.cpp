@@ -4,8 +4,8 @@
 #include "core/detail/guard.h"
 #include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
+#include "core/detail/setting_switch.h"
 #include "service/detail/service_table.h"
-#include "service/detail/settings_files.h"
 #include "service/detail/volume_list.h"
 
 #include <cstdio>
@@ -30,7 +30,7 @@ extern "C" int TAVOServiceSettingGet(int idShare, TAVOSERVICESHARE *pShare)
     TAVOSERVICESHARE share = row->share;
     std::snprintf(share.szShareName, sizeof share.szShareName, "%s%s", kNamings[share.nNaming], share.szShare);
     for (const char *key : row->capability_keys) {
-        if (key && tavo::SettingIs(tavo::kFactorySettings, key, "yes"))
+        if (key && tavo::SettingSaysYes(tavo::kFactorySettings, key))
             share.fSupported = 1;
     }
     const int result = TAVOServiceVolumeGetbyLink(share.szLink, share.szVolume, sizeof share.szVolume,

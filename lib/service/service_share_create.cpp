@@ -36,7 +36,7 @@ extern "C" int TAVOServiceShareCreate(int idShare, const char *szVolume)
         if (!MakeFolders(path))
             return Fail(errno == ENOSPC ? ERR_NOT_ENOUGH_SPACE : ERR_MKDIR_FAILED);
         tavo::FindDataFolder(idShare, share);
-        if (const int code = tavo::RecordShare(share.szShareName, path))
+        if (const tavo::Code code = tavo::RecordShare(share.szShareName, path))
             return Fail(code);
         return 0;
     });

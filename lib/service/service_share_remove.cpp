@@ -13,7 +13,7 @@
 namespace {
 
 // A user who may write to the volume must not choose what root deletes.
-bool IsBehindNoLink(const std::string &path)
+bool HasNoLinks(const std::string &path)
 {
     for (size_t slash = path.find('/', 1); slash != std::string::npos; slash = path.find('/', slash + 1)) {
         if (!tavo::IsRealFolder(path.substr(0, slash).c_str()))
@@ -32,18 +32,18 @@ extern "C" int TAVOServiceShareRemove(int idShare, int fDelete)
         return Fail(ERR_BAD_PARAMETERS);
     tavo::FindDataFolder(idShare, share);
     return Guard([&] {
-        std::string path;
-        if (const int code = tavo::SharePath(share.szShareName, path))
-            return Fail(code);
+        tavo::Result<std::string> path = tavo::SharePath(share.szShareName);
+        if (!path)
+            return Fail(path.Failure());
         // The library never records a path outside the volumes, so it deletes nothing for such a record.
-        if (fDelete && !tavo::VolumeOf(path).empty() && path.find("/../") == std::string::npos &&
-            path.ends_with(share.szShareName) && IsBehindNoLink(path)) {
+        if (fDelete && !tavo::VolumeOf(*path).empty() && path->find("/../") == std::string::npos &&
+            path->ends_with(share.szShareName) && HasNoLinks(*path)) {
             std::error_code failed;
-            std::filesystem::remove_all(path, failed);  // deletes links, never follows them
+            std::filesystem::remove_all(*path, failed);  // deletes links, never follows them
             if (failed)
                 return Fail(ERR_REMOVE_FAILED);
         }
-        if (const int code = tavo::ForgetShare(share.szShareName))
+        if (const tavo::Code code = tavo::ForgetShare(share.szShareName))
             return Fail(code);
         return 0;
     });

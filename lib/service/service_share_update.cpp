@@ -17,12 +17,12 @@ extern "C" int TAVOServiceShareUpdate(int idShare, const char *szVolume)
         return -1;
     tavo::FindDataFolder(idShare, share);
     return Guard([&] {
-        std::string recorded;
-        if (const int code = tavo::SharePath(share.szShareName, recorded))
-            return Fail(code);
-        if (recorded.empty())
+        tavo::Result<std::string> recorded = tavo::SharePath(share.szShareName);
+        if (!recorded)
+            return Fail(recorded.Failure());
+        if (recorded->empty())
             return Fail(ERR_NO_SUCH_SHARE);
-        if (const int code = tavo::RecordShare(share.szShareName, path))
+        if (const tavo::Code code = tavo::RecordShare(share.szShareName, path))
             return Fail(code);
         return 0;
     });

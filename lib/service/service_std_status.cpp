@@ -1,16 +1,14 @@
 // Checks whether a service is enabled, has its data folders and runs: the standard handler.
 #include "tavo_service.h"
 
-#include "tavo_file.h"
 #include "tavo_lock.h"
 #include "tavo_proc.h"
 
 #include "core/detail/guard.h"
-#include "core/detail/keep_fault.h"
 #include "core/detail/process_list.h"
+#include "core/detail/setting_switch.h"
 #include "service/detail/process_named.h"
 #include "service/detail/service_table.h"
-#include "service/detail/settings_files.h"
 
 #include <cstring>
 
@@ -21,12 +19,6 @@ constexpr int kLockSeconds = 5;
 
 enum class Enabled { no, yes, unknown };
 
-bool IsNo(const char *key)
-{
-    const tavo::KeepFault keep;
-    return BlTAVOFileCheckKeyValue(tavo::kSettings, key, "no");
-}
-
 // Only "no" switches a service off: a service whose key was never written is on.
 Enabled IsEnabled(const char *key)
 {
@@ -34,7 +26,7 @@ Enabled IsEnabled(const char *key)
         return Enabled::yes;
     if (ErrTLIBFileLock(kSettingsLock | TAVO_LOCK_SHARED | TAVO_LOCK_NONBLOCKING, kLockSeconds) != 0)
         return Enabled::unknown;
-    const bool no = IsNo(key);
+    const bool no = tavo::SettingEquals(tavo::kSettings, key, "no");
     if (ErrTLIBFileUnlock(kSettingsLock) != 0)
         return Enabled::unknown;
     return no ? Enabled::no : Enabled::yes;

@@ -3,7 +3,7 @@
 
 #include "core/detail/log.h"
 #include "service/detail/service_table.h"
-#include "service/detail/settings_files.h"
+#include "service/detail/switched_on.h"
 
 extern "C" int TAVOServiceVolumeChange(int idShare, const char *szVolume)
 {

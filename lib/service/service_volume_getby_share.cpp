@@ -13,12 +13,12 @@ extern "C" int TAVOServiceVolumeGetbyShare(const char *szShare, char *szVolume, 
     if (!szShare || !*szShare || !szVolume || cbVolume <= 0)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        std::string path;
-        if (const int code = tavo::SharePath(szShare, path))
-            return Fail(code);
-        const std::string_view volume = tavo::VolumeOf(path);
+        tavo::Result<std::string> path = tavo::SharePath(szShare);
+        if (!path)
+            return Fail(path.Failure());
+        const std::string_view volume = tavo::VolumeOf(*path);
         if (volume.empty())
-            return static_cast<int>(FailZero(ERR_NO_SUCH_SHARE));
+            return FailNone(ERR_NO_SUCH_SHARE);
         if (volume.size() >= static_cast<size_t>(cbVolume))
             return Fail(ERR_NOT_ENOUGH_MEMORY);
         std::memcpy(szVolume, volume.data(), volume.size());

@@ -3,8 +3,8 @@
 
 #include "account/detail/salt_char.h"
 #include "account/detail/secret_text.h"
-#include "account/detail/setting_switch.h"
 #include "core/detail/extras.h"
+#include "core/detail/setting_switch.h"
 
 #include <cerrno>
 #include <new>

@@ -12,7 +12,7 @@ namespace {
 constexpr int32_t kReplacement = 0xFFFD;
 
 // The code of a conversion that gave this length.
-int Code(int32_t length)
+int LengthCode(int32_t length)
 {
     if (length == kNoMemory)
         throw std::bad_alloc();
@@ -24,7 +24,7 @@ int Utf16(const Extras &extras, std::string_view utf8, SecretUtf16 &units)
     units.resize(utf8.size() + 1);  // no character has more units than it has bytes
     const int32_t length = extras.to_utf16(utf8.data(), static_cast<int32_t>(utf8.size()), kReplacement, units.data(),
                                            static_cast<int32_t>(units.size()));
-    const int code = Code(length);
+    const int code = LengthCode(length);
     units.resize(code == 0 ? static_cast<size_t>(length) : 0);
     return code;
 }
@@ -54,7 +54,7 @@ int UpperCodePage850(std::string_view utf8, SecretBytes &bytes)
     bytes.resize(2 * upper.size() + 1);
     const int32_t length = extras->to_code_page_850(upper.data(), static_cast<int32_t>(upper.size()), bytes.data(),
                                                     static_cast<int32_t>(bytes.size()));
-    const int code = Code(length);
+    const int code = LengthCode(length);
     bytes.resize(code == 0 ? static_cast<size_t>(length) : 0);
     return code;
 }

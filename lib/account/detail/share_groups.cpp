@@ -88,7 +88,7 @@ int ChangeGroupsInShares(const TLIBSZHASH *names)
     if (!file.Read(text))
         return ERR_READ_FAILED;
     const std::string changed = ChangeShareGroups(text, names);
-    return changed == text ? 0 : file.Replace(changed);
+    return changed == text ? Code() : file.Replace(changed);
 }
 
 }  // namespace tavo

@@ -2,11 +2,11 @@
 #include "account/detail/user_homes.h"
 
 #include "account/detail/account_name.h"
-#include "account/detail/setting_switch.h"
 #include "core/detail/keep_fault.h"
 #include "core/detail/list_owner.h"
 #include "core/detail/open_file.h"
 #include "core/detail/run_command.h"
+#include "core/detail/setting_switch.h"
 #include "core/detail/shell_command.h"
 #include "tavo_section.h"
 

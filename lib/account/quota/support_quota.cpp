@@ -1,8 +1,8 @@
 // Tells whether the model has quotas.
 #include "tavo_quota.h"
 
-#include "account/detail/setting_switch.h"
 #include "core/detail/keep_fault.h"
+#include "core/detail/setting_switch.h"
 #include "tavo_file.h"
 
 #include <strings.h>

@@ -1,8 +1,8 @@
 // Tells how many more accounts may be created.
 #include "tavo_user.h"
 
-#include "account/detail/setting_switch.h"
 #include "core/detail/fault.h"
+#include "core/detail/setting_switch.h"
 #include "tavo_file.h"
 
 #include <charconv>

@@ -3,7 +3,6 @@
 
 #include "account/detail/account_name.h"
 #include "account/detail/account_transaction.h"
-#include "account/detail/setting_switch.h"
 #include "account/detail/smb_connections.h"
 #include "account/detail/user_dump.h"
 #include "account/detail/user_texts.h"
@@ -11,6 +10,7 @@
 #include "core/detail/keep_fault.h"
 #include "core/detail/list_owner.h"
 #include "core/detail/log.h"
+#include "core/detail/setting_switch.h"
 #include "tavo_appliance.h"
 #include "tavo_lock.h"
 #include "tavo_quota.h"

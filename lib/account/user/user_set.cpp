@@ -2,12 +2,12 @@
 #include "tavo_user.h"
 
 #include "account/detail/account_transaction.h"
-#include "account/detail/setting_switch.h"
 #include "account/detail/user_dump.h"
 #include "account/detail/user_texts.h"
 #include "core/detail/guard.h"
 #include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
+#include "core/detail/setting_switch.h"
 #include "tavo_appliance.h"
 #include "tavo_lock.h"
 

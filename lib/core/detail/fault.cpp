@@ -21,4 +21,10 @@ bool FailZero(int code, Where where) noexcept
     return false;
 }
 
+int FailNone(int code, Where where) noexcept
+{
+    Fail(code, where);
+    return 0;
+}
+
 }  // namespace tavo

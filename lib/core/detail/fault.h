@@ -21,13 +21,17 @@ int Fail(int code, Where where = Where()) noexcept;
 // The same for pointer results.
 decltype(nullptr) FailNull(int code, Where where = Where()) noexcept;
 
-// The same for results whose failure value is 0 or false.
+// The same for results whose failure value is false.
 bool FailZero(int code, Where where = Where()) noexcept;
+
+// The same for integer results where 0 is the answer that there is none.
+int FailNone(int code, Where where = Where()) noexcept;
 
 }  // namespace tavo
 
 // Exported functions are outside the namespace and report in every other line.
 using tavo::Fail;
+using tavo::FailNone;
 using tavo::FailNull;
 using tavo::FailZero;
 

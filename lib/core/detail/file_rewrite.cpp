@@ -35,7 +35,7 @@ bool SyncDirectory(const std::string &path) noexcept
 
 }  // namespace
 
-int FileRewrite::Open(const char *path)
+Code FileRewrite::Open(const char *path)
 {
     target_ = FileTarget(path);
     if (target_.empty())
@@ -94,7 +94,7 @@ bool FileRewrite::Complete(Fd &temp, std::string_view text, mode_t mode_of_new) 
     return SyncFd(fd) && temp.Close();
 }
 
-int FileRewrite::ReplaceBy(TempFile &temp, std::string_view text, mode_t mode_of_new)
+Code FileRewrite::ReplaceBy(TempFile &temp, std::string_view text, mode_t mode_of_new)
 {
     const std::string directory = DirectoryOf(target_);
     if (!Complete(temp.File(), text, mode_of_new))
@@ -105,7 +105,7 @@ int FileRewrite::ReplaceBy(TempFile &temp, std::string_view text, mode_t mode_of
     return 0;
 }
 
-int FileRewrite::Replace(std::string_view text, mode_t mode_of_new)
+Code FileRewrite::Replace(std::string_view text, mode_t mode_of_new)
 {
     TempFile temp;
     if (!temp.CreateBeside(target_))

@@ -4,6 +4,7 @@
 #define TAVO_CORE_DETAIL_FILE_REWRITE_H
 
 #include "core/detail/open_file.h"
+#include "core/detail/result.h"
 #include "core/detail/temp_file.h"
 
 #include <string>
@@ -11,13 +12,12 @@
 
 namespace tavo {
 
-// Returns codes for the caller to report; 0 is success.
 class FileRewrite {
   public:
     // Opens the file to be replaced: ERR_OPEN_FAILED (also when it is not a regular file) or ERR_STAT_FAILED. A missing
     // file is ERR_OPEN_FAILED with IsMissing(); Replace then creates it. A symbolic link is followed, except in a
     // directory that everybody may write to.
-    int Open(const char *path);
+    Code Open(const char *path);
     bool IsMissing() const noexcept { return missing_; }
 
     // Reads the old text; false after a read error.
@@ -25,10 +25,10 @@ class FileRewrite {
 
     // ERR_OPEN_FAILED: no temporary file; ERR_WRITE_FAILED: it could not be completed (errno has the reason);
     // ERR_RENAME_FAILED. An existing file keeps its owner and mode. A new one gets `mode_of_new`, whatever the umask.
-    int Replace(std::string_view text, mode_t mode_of_new = 0644);
+    Code Replace(std::string_view text, mode_t mode_of_new = 0644);
 
     // The same through a temporary file elsewhere; ERR_RENAME_FAILED with EXDEV when it is on another file system.
-    int ReplaceBy(TempFile &temp, std::string_view text, mode_t mode_of_new = 0644);
+    Code ReplaceBy(TempFile &temp, std::string_view text, mode_t mode_of_new = 0644);
 
     // The first half of that, for callers that rename several files together: writes text, owner, mode and attributes
     // to `temp`, syncs and closes it. False with errno.

@@ -1,6 +1,7 @@
 // Searches a file for one line.
 #include "core/detail/line_search.h"
 
+#include "core/detail/fault.h"
 #include "core/detail/key_value_line.h"
 #include "core/detail/line_reader.h"
 #include "core/detail/open_file.h"
@@ -10,12 +11,13 @@ namespace tavo {
 namespace {
 
 template <class Wanted>
-int FindLine(const char *path, Match which, FoundLine &found, Wanted &&wanted)
+Result<FoundLine> FindLine(const char *path, Match which, Wanted &&wanted)
 {
     const Fd fd = OpenRegular(path, O_RDONLY);
     if (!fd)
-        return ERR_OPEN_FAILED;
+        return Code(ERR_OPEN_FAILED);
     LineReader reader(fd.Get());
+    FoundLine found;
     std::string_view line;
     for (int number = 1; reader.Next(line); ++number) {
         if (!wanted(number, line))
@@ -23,23 +25,30 @@ int FindLine(const char *path, Match which, FoundLine &found, Wanted &&wanted)
         found.number = number;
         found.text = UpToNul(WithoutNewline(line));
         if (which == Match::first)
-            return 0;
+            return found;
     }
     if (reader.Failed())
-        return ERR_READ_FAILED;
-    return found.number ? 0 : ERR_KEY_NOT_FOUND;
+        return Code(ERR_READ_FAILED);
+    if (!found.number)
+        return Code(ERR_KEY_NOT_FOUND);
+    return found;
 }
 
 }  // namespace
 
-int FindLineByNumber(const char *path, int number, FoundLine &found)
+Result<FoundLine> FindLineByNumber(const char *path, int number)
 {
-    return FindLine(path, Match::first, found, [&](int at, std::string_view) { return at == number; });
+    return FindLine(path, Match::first, [&](int at, std::string_view) { return at == number; });
 }
 
-int FindLineByKey(const char *path, std::string_view key, Match which, FoundLine &found)
+Result<FoundLine> FindLineByKey(const char *path, std::string_view key, Match which)
 {
-    return FindLine(path, which, found, [&](int, std::string_view line) { return LineSetsKey(line, key); });
+    return FindLine(path, which, [&](int, std::string_view line) { return LineSetsKey(line, key); });
+}
+
+int ReportSearch(Code failure, Where where) noexcept
+{
+    return failure == ERR_KEY_NOT_FOUND ? FailNone(failure, where) : Fail(failure, where);
 }
 
 int CopyOut(std::string_view text, char *buffer, int size)

@@ -1,6 +1,7 @@
 // Reads the model's capabilities.
 #include "core/detail/model_setting.h"
 
+#include "core/detail/appliance_paths.h"
 #include "core/detail/key_value_line.h"
 #include "core/detail/line_search.h"
 
@@ -12,10 +13,8 @@ namespace tavo {
 
 std::optional<std::string> ModelSetting(const char *key)
 {
-    FoundLine line;
-    if (FindLineByKey(kModelSettings, key, Match::first, line) != 0)
-        return std::nullopt;
-    return std::string(LineValue(line.text));
+    Result<FoundLine> line = FindLineByKey(kFactorySettings, key, Match::first);
+    return line ? std::optional<std::string>(LineValue(line->text)) : std::nullopt;
 }
 
 bool ModelHas(const char *key)

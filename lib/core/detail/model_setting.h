@@ -9,8 +9,6 @@
 
 namespace tavo {
 
-inline constexpr const char *kModelSettings = "/etc.defaults/tavoinfo.conf";
-
 // Returns the value of a key; empty when the file does not set it. Throws bad_alloc.
 std::optional<std::string> ModelSetting(const char *key);
 

@@ -2,9 +2,9 @@
 #include "core/detail/process_list.h"
 
 #include "core/detail/folder_reader.h"
+#include "core/detail/strict_number.h"
 
 #include <algorithm>
-#include <charconv>
 #include <new>
 
 #include <fcntl.h>
@@ -73,13 +73,12 @@ std::vector<Process> ListProcesses()
     FolderReader proc("/proc");
     while (const char *const entry = proc.Next()) {
         const std::string name = entry;
-        pid_t pid = 0;
-        const auto [end, error] = std::from_chars(name.data(), name.data() + name.size(), pid);
-        if (error != std::errc() || *end != 0 || pid < 1)
+        const std::optional<pid_t> pid = StrictNumber<pid_t>(name);
+        if (!pid || *pid < 1)
             continue;
         std::string command = Command(proc.Descriptor(), name);
         if (!command.empty())
-            processes.push_back({pid, std::move(command)});
+            processes.push_back({*pid, std::move(command)});
     }
     if (proc.Failed() && errno != ENOENT)
         throw std::bad_alloc();  // an incomplete table would hide running processes

@@ -17,7 +17,7 @@ void LogUnsyncedDirectory(const FileRewrite &rewrite, Where where)
 
 int ReplaceOrFail(FileRewrite &rewrite, std::string_view text, Where where)
 {
-    if (const int code = rewrite.Replace(text))
+    if (const Code code = rewrite.Replace(text))
         return Fail(code, where);
     LogUnsyncedDirectory(rewrite, where);
     return 0;
@@ -25,7 +25,7 @@ int ReplaceOrFail(FileRewrite &rewrite, std::string_view text, Where where)
 
 int ReadOrFail(FileRewrite &rewrite, const char *path, std::string &text, Where where)
 {
-    if (const int code = rewrite.Open(path))
+    if (const Code code = rewrite.Open(path))
         return Fail(code, where);
     return rewrite.Read(text) ? 0
                               : Fail(ERR_WRITE_FAILED, where);  // the one code for everything between open and rename
@@ -36,14 +36,14 @@ int RewriteText(const char *path, Missing missing, TextEdit edit, Where where) n
     const auto rewrite_text = [&] {
         FileRewrite rewrite;
         std::string text;
-        const int code = rewrite.Open(path);
+        const Code code = rewrite.Open(path);
         if (code && !(rewrite.IsMissing() && missing == Missing::create))
             return Fail(code, where);
         if (!code && !rewrite.Read(text))
             return Fail(ERR_WRITE_FAILED, where);
         const std::optional<std::string> changed = edit(std::string_view(text));
         if (!changed)
-            return static_cast<int>(FailZero(ERR_KEY_NOT_FOUND, where));
+            return FailNone(ERR_KEY_NOT_FOUND, where);
         return ReplaceOrFail(rewrite, *changed, where) == 0 ? 1 : -1;
     };
     return Guard(rewrite_text, ERR_OUT_OF_MEMORY, where);

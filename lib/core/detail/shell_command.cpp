@@ -1,6 +1,8 @@
 // Composes command lines for the shell from fixed formats.
 #include "core/detail/shell_command.h"
 
+#include "core/detail/ascii.h"
+
 #include <algorithm>
 #include <vector>
 
@@ -9,8 +11,7 @@ namespace {
 
 bool IsPlain(char byte)
 {
-    return (byte >= 'A' && byte <= 'Z') || (byte >= 'a' && byte <= 'z') || (byte >= '0' && byte <= '9') ||
-           std::string_view("_@%+=:,./-").find(byte) != std::string_view::npos;
+    return IsLetter(byte) || IsDigit(byte) || std::string_view("_@%+=:,./-").find(byte) != std::string_view::npos;
 }
 
 // Quotes text for the space between two single quotes: a quote ends the first pair, is escaped, and opens another.

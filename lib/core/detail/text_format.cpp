@@ -1,6 +1,8 @@
 // Fills printf-like formats with typed arguments.
 #include "core/detail/text_format.h"
 
+#include "core/detail/ascii.h"
+
 #include <cstdio>
 #include <cstring>
 
@@ -22,7 +24,7 @@ Conversion ReadConversion(const char *percent)
         found.zeros = true;
         ++at;
     }
-    for (; *at >= '0' && *at <= '9' && found.width < 100; ++at)
+    for (; IsDigit(*at) && found.width < 100; ++at)
         found.width = found.width * 10 + (*at - '0');
     while (*at && std::strchr("hljzt", *at))
         ++at;

@@ -14,10 +14,9 @@ namespace {
 int CreateWith(const char *path, const std::string &line)
 {
     tavo::FileRewrite rewrite;
-    rewrite.Open(path);
-    if (!rewrite.IsMissing())  // another process has created it since
+    if (rewrite.Open(path) == 0 || !rewrite.IsMissing())  // another process has created it since
         return Fail(ERR_OPEN_FAILED);
-    const int code = rewrite.Replace(line);
+    const tavo::Code code = rewrite.Replace(line);
     if (code == ERR_WRITE_FAILED)
         return Fail(code, Line{66});
     if (code)

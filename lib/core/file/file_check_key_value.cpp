@@ -10,9 +10,7 @@ extern "C" int BlTAVOFileCheckKeyValue(const char *szPath, const char *szKey, co
     if (!szPath || !szKey || !szValue)
         return FailZero(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        tavo::FoundLine line;
-        if (const int code = tavo::FindLineByKey(szPath, szKey, tavo::Match::first, line))
-            return FailZero(code);
-        return tavo::LineValue(line.text) == szValue;
+        tavo::Result<tavo::FoundLine> line = tavo::FindLineByKey(szPath, szKey, tavo::Match::first);
+        return line ? tavo::LineValue(line->text) == szValue : FailZero(line.Failure());
     });
 }

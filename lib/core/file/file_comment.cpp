@@ -102,7 +102,7 @@ extern "C" int TLIBFileComment(const char *szPath, const char *szKey)
             return -1;
         const std::optional<std::string> changed = WithComments(text, szKey);
         if (!changed)
-            return static_cast<int>(FailZero(ERR_KEY_NOT_FOUND));
+            return FailNone(ERR_KEY_NOT_FOUND);
         if (ReplaceByScratch(rewrite, *changed)) {
             tavo::LogUnsyncedDirectory(rewrite);
             return 1;

@@ -9,13 +9,10 @@ extern "C" int TLIBFileGetLine(const char *szPath, int lineNo, char *szBuf, int 
     if (!szPath || lineNo < 1 || (cbBuf != 0 && !szBuf))
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        tavo::FoundLine line;
-        const int code = tavo::FindLineByNumber(szPath, lineNo, line);
-        if (code == ERR_KEY_NOT_FOUND)
-            return static_cast<int>(FailZero(code));
-        if (code)
-            return Fail(code);
-        const int length = tavo::CopyOut(line.text, szBuf, cbBuf);
+        tavo::Result<tavo::FoundLine> line = tavo::FindLineByNumber(szPath, lineNo);
+        if (!line)
+            return tavo::ReportSearch(line.Failure());
+        const int length = tavo::CopyOut(line->text, szBuf, cbBuf);
         return szBuf && length > cbBuf ? Fail(ERR_NOT_ENOUGH_MEMORY) : length;
     });
 }

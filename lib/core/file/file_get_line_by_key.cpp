@@ -9,13 +9,10 @@ extern "C" int TLIBFileGetLineByKey(const char *szPath, const char *szKey, char 
     if (!szPath || !szKey || (cbBuf != 0 && !szBuf))
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        tavo::FoundLine line;
-        const int code = tavo::FindLineByKey(szPath, szKey, tavo::Match::first, line);
-        if (code == ERR_KEY_NOT_FOUND)
-            return static_cast<int>(FailZero(code));
-        if (code)
-            return Fail(code);
-        const int length = tavo::CopyOut(line.text, szBuf, cbBuf);
+        tavo::Result<tavo::FoundLine> line = tavo::FindLineByKey(szPath, szKey, tavo::Match::first);
+        if (!line)
+            return tavo::ReportSearch(line.Failure());
+        const int length = tavo::CopyOut(line->text, szBuf, cbBuf);
         return szBuf && length > cbBuf ? Fail(ERR_NOT_ENOUGH_MEMORY) : length;
     });
 }

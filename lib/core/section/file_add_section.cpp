@@ -19,7 +19,8 @@ extern "C" int ErrTLIBFileAddSection(const char *szPath, const char *szSection, 
         if (fd)
             return tavo::AppendText(fd.Get(), *text) ? 0 : Fail(ERR_WRITE_FAILED);
         tavo::FileRewrite rewrite;
-        rewrite.Open(szPath);
-        return rewrite.IsMissing() ? tavo::ReplaceOrFail(rewrite, *text) : Fail(ERR_OPEN_FAILED);
+        if (rewrite.Open(szPath) == 0 || !rewrite.IsMissing())
+            return Fail(ERR_OPEN_FAILED);
+        return tavo::ReplaceOrFail(rewrite, *text);
     });
 }

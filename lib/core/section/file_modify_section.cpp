@@ -54,7 +54,7 @@ extern "C" int TLIBIFileModifySection(const char *szPath, const char *szSection,
     return Guard([&] {
         tavo::FileRewrite rewrite;
         std::string text;
-        if (const int code = rewrite.Open(szPath))
+        if (const tavo::Code code = rewrite.Open(szPath))
             return Fail(code);
         if (!rewrite.Read(text))
             return Fail(ERR_READ_FAILED);
@@ -63,6 +63,6 @@ extern "C" int TLIBIFileModifySection(const char *szPath, const char *szSection,
         const std::optional<std::string> changed = Changed(text, change, found);
         if (!changed || tavo::ReplaceOrFail(rewrite, *changed) != 0)
             return -1;
-        return found ? 1 : static_cast<int>(FailZero(ERR_KEY_NOT_FOUND));
+        return found ? 1 : FailNone(ERR_KEY_NOT_FOUND);
     });
 }

@@ -84,7 +84,7 @@ int UpdateHosts(std::string_view old_name)
     if (!rewrite.IsMissing() && !rewrite.Read(text))
         return ERR_READ_FAILED;
     const std::string edited = NewText(text, old_name);
-    return edited == text ? 0 : rewrite.Replace(edited, 0644);
+    return edited == text ? Code() : rewrite.Replace(edited, 0644);
 }
 
 bool AreHostsTrue()

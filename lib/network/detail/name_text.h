@@ -2,22 +2,14 @@
 #ifndef TAVO_NETWORK_DETAIL_NAME_TEXT_H
 #define TAVO_NETWORK_DETAIL_NAME_TEXT_H
 
+#include "core/detail/ascii.h"
+
 #include <string_view>
 
 namespace tavo {
 
 // Of the sixteen bytes of a NetBIOS name the last is its type.
 inline constexpr size_t kLongestNetbiosName = 15;
-
-constexpr bool IsLetter(char byte) noexcept
-{
-    return (byte >= 'a' && byte <= 'z') || (byte >= 'A' && byte <= 'Z');
-}
-
-constexpr bool IsDigit(char byte) noexcept
-{
-    return byte >= '0' && byte <= '9';
-}
 
 // Labels of letters, digits and inner hyphens, 1 to 63 bytes each, joined by dots; 255 bytes in all.
 bool IsDomainText(std::string_view text) noexcept;

@@ -22,7 +22,7 @@ constexpr unsigned kSharesLock = TAVO_LOCK_SMB | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK
 constexpr int kLockSeconds = 5;
 constexpr int kHashBytes = 512;
 
-int ReadShare(const char *name, HashOwner &share)
+Code ReadShare(const char *name, HashOwner &share)
 {
     share.Reset(PshTLIBSzHashAlloc(kHashBytes));
     if (!share)
@@ -36,17 +36,16 @@ int ReadShare(const char *name, HashOwner &share)
 
 }  // namespace
 
-int SharePath(const char *name, std::string &path)
+Result<std::string> SharePath(const char *name)
 {
     HashOwner share;
-    if (const int code = ReadShare(name, share))
+    if (const Code code = ReadShare(name, share))
         return code;
     const char *value = SzTLIBSzHashGetValue(share.Get(), "path");
-    path = value ? value : "";
-    return 0;
+    return std::string(value ? value : "");
 }
 
-int RecordShare(const char *name, const std::string &path)
+Code RecordShare(const char *name, const std::string &path)
 {
     const LockHold lock(kSharesLock, kLockSeconds);
     HashOwner share;
@@ -54,7 +53,7 @@ int RecordShare(const char *name, const std::string &path)
         return TLIBErrGet();
     if (TLIBFileTouch(kShares) != 0)
         return TLIBErrGet();
-    if (const int code = ReadShare(name, share))
+    if (const Code code = ReadShare(name, share))
         return code;
     if (TLIBSzHashSetValue(share.Addr(), "path", path.c_str()) < 0)
         return ERR_OUT_OF_MEMORY;
@@ -66,14 +65,14 @@ int RecordShare(const char *name, const std::string &path)
     return 0;
 }
 
-int ForgetShare(const char *name)
+Code ForgetShare(const char *name)
 {
     const LockHold lock(kSharesLock, kLockSeconds);
-    std::string path;
     if (!lock)
         return TLIBErrGet();
-    if (const int code = SharePath(name, path); code != 0 || path.empty())
-        return code;
+    Result<std::string> path = SharePath(name);
+    if (!path || path->empty())
+        return path.Failure();
     return ErrTLIBFileRemoveSection(kShares, name) < 0 ? TLIBErrGet() : 0;
 }
 

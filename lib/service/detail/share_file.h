@@ -2,20 +2,22 @@
 #ifndef TAVO_SERVICE_DETAIL_SHARE_FILE_H
 #define TAVO_SERVICE_DETAIL_SHARE_FILE_H
 
+#include "core/detail/result.h"
+
 #include <string>
 
 namespace tavo {
 
-// Each function returns 0 or a code. Changes are made under the lock of the shares.
+// Changes are made under the lock of the shares.
 
 // Returns the share's path; empty when it is not recorded.
-int SharePath(const char *name, std::string &path);
+Result<std::string> SharePath(const char *name);
 
 // Sets the path of a share and keeps the other keys of its section; adds a missing share.
-int RecordShare(const char *name, const std::string &path);
+Code RecordShare(const char *name, const std::string &path);
 
 // Removing a share that is not recorded succeeds.
-int ForgetShare(const char *name);
+Code ForgetShare(const char *name);
 
 }  // namespace tavo
 

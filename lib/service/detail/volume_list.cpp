@@ -2,10 +2,10 @@
 #include "service/detail/volume_list.h"
 
 #include "core/detail/open_file.h"
+#include "core/detail/strict_number.h"
 #include "core/detail/text_fields.h"
 
 #include <algorithm>
-#include <charconv>
 
 #include <climits>
 
@@ -51,12 +51,10 @@ bool IsBehindUsb(std::string_view device)
 
 int VolumeNumber(std::string_view path) noexcept
 {
-    int number = 0;
-    if (!path.starts_with(kStem))
+    if (!path.starts_with(kStem) || path.substr(kStem.size()).starts_with('0'))
         return 0;
-    const char *const end = path.data() + path.size();
-    const auto [next, error] = std::from_chars(path.data() + kStem.size(), end, number);
-    return error == std::errc() && next == end && number > 0 && path[kStem.size()] != '0' ? number : 0;
+    const std::optional<int> number = StrictNumber<int>(path.substr(kStem.size()));
+    return number && *number > 0 ? *number : 0;
 }
 
 std::string_view VolumeOf(std::string_view path) noexcept

@@ -2,8 +2,8 @@
 #ifndef TAVO_STORAGE_DETAIL_ARRAY_NAME_H
 #define TAVO_STORAGE_DETAIL_ARRAY_NAME_H
 
+#include "core/detail/strict_number.h"
 #include "storage/detail/device_name.h"
-#include "storage/detail/strict_number.h"
 
 #include <optional>
 #include <string>

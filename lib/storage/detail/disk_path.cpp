@@ -1,6 +1,7 @@
 // Paths of disks.
 #include "storage/detail/disk_path.h"
 
+#include "core/detail/ascii.h"
 #include "storage/detail/device_name.h"
 
 #include <charconv>
@@ -8,16 +9,6 @@
 
 namespace tavo {
 namespace {
-
-constexpr bool IsLetter(char c)
-{
-    return c >= 'a' && c <= 'z';
-}
-
-constexpr bool IsDigit(char c)
-{
-    return c >= '0' && c <= '9';
-}
 
 constexpr int32_t IndexOf(char letter)
 {
@@ -39,9 +30,9 @@ ParsedDiskPath ParseDiskPath(const char *text)
         return {Outcome::no_disk, {}, nullptr};
     at += 2;
     DISKPATH path = {};
-    if (!IsLetter(at[0]))
+    if (!IsLower(at[0]))
         return {*at ? Outcome::bad_tail : Outcome::no_disk, {}, at};
-    if (IsLetter(at[1])) {
+    if (IsLower(at[1])) {
         path = {IndexOf(at[1]), DISK_NAME_UNIT, IndexOf(at[0]), 0};
         at += 2;
     } else {

@@ -3,7 +3,7 @@
 
 #include "core/detail/line_reader.h"
 #include "core/detail/open_file.h"
-#include "storage/detail/strict_number.h"
+#include "core/detail/strict_number.h"
 
 namespace tavo {
 

@@ -1,8 +1,8 @@
 // Lines of pvs and vgs.
 #include "storage/detail/lvm_line.h"
 
+#include "core/detail/strict_number.h"
 #include "storage/detail/bounded_text.h"
-#include "storage/detail/strict_number.h"
 
 #include <array>
 #include <cstdio>

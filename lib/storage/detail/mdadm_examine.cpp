@@ -1,10 +1,10 @@
 // Reads what "mdadm -E" says about a member's superblock, line by line.
 #include "storage/detail/mdadm_examine.h"
 
+#include "core/detail/strict_number.h"
 #include "storage/detail/array_level.h"
 #include "storage/detail/array_name.h"
 #include "storage/detail/bounded_text.h"
-#include "storage/detail/strict_number.h"
 
 #include <algorithm>
 #include <climits>

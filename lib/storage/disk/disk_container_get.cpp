@@ -1,6 +1,7 @@
 // Tells where a disk sits.
 #include "tavo_disk.h"
 
+#include "core/detail/ascii.h"
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "core/detail/model_setting.h"
@@ -14,21 +15,16 @@ constexpr size_t kShortest = 3;
 constexpr size_t kLongest = 15;
 constexpr char kLastBay = 'j';
 
-constexpr bool IsLetter(char c)
-{
-    return c >= 'a' && c <= 'z';
-}
-
 constexpr bool EndsName(char c)
 {
-    return c == 0 || c == '\n' || (c >= '0' && c <= '9');
+    return c == 0 || c == '\n' || tavo::IsDigit(c);
 }
 
 std::optional<int> KindOf(const std::string &name, char port, char next)
 {
-    if (IsLetter(port) && IsLetter(next))
+    if (tavo::IsLower(port) && tavo::IsLower(next))
         return DISK_CONTAINER_UNIT;
-    if (!IsLetter(port) || !EndsName(next))
+    if (!tavo::IsLower(port) || !EndsName(next))
         return std::nullopt;
     if (tavo::ModelSetting("esatadiskname") == name)
         return DISK_CONTAINER_ESATA;

@@ -1,22 +1,18 @@
 // Reads the saved spin-down minutes.
 #include "tavo_disk.h"
 
+#include "core/detail/appliance_paths.h"
 #include "core/detail/guard.h"
 #include "core/detail/key_value_line.h"
 #include "core/detail/line_search.h"
-
-#include <charconv>
+#include "core/detail/strict_number.h"
 
 extern "C" int TAVODiskGetFileSBTimerSetting(void)
 {
     return Guard([&] {
         // A missing key is no failure: a new appliance has never saved one.
-        tavo::FoundLine line;
-        if (tavo::FindLineByKey("/etc/tavoinfo.conf", "standbytimer", tavo::Match::first, line) != 0)
-            return -1;
-        const std::string_view value = tavo::LineValue(line.text);
-        int minutes = 0;
-        const auto [end, error] = std::from_chars(value.data(), value.data() + value.size(), minutes);
-        return error == std::errc{} && end == value.data() + value.size() && minutes >= 0 ? minutes : -1;
+        tavo::Result<tavo::FoundLine> line = tavo::FindLineByKey(tavo::kSettings, "standbytimer", tavo::Match::first);
+        const auto minutes = line ? tavo::StrictNumber<int>(tavo::LineValue(line->text)) : std::nullopt;
+        return minutes && *minutes >= 0 ? *minutes : -1;
     });
 }

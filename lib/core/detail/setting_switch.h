@@ -1,0 +1,20 @@
+// Switches of settings files. A missing key is an ordinary answer, so the error state is not touched.
+#ifndef TAVO_CORE_DETAIL_SETTING_SWITCH_H
+#define TAVO_CORE_DETAIL_SETTING_SWITCH_H
+
+#include "core/detail/appliance_paths.h"
+
+namespace tavo {
+
+// Whether the key has exactly this value.
+bool SettingEquals(const char *path, const char *key, const char *value) noexcept;
+
+// Whether the value is exactly "yes".
+bool SettingIsYes(const char *path, const char *key) noexcept;
+
+// Whether the value is "yes" in any case of letters: services and capabilities of the model.
+bool SettingSaysYes(const char *path, const char *key) noexcept;
+
+}  // namespace tavo
+
+#endif
