@@ -127,6 +127,8 @@ Json SchemaOf(const Answer &answer)
         return ListOf(answer.columns, Details::some);
     case Answer::change:
         return ChangeSchema();
+    case Answer::own:
+        return Json::parse(answer.schema());
     default:
         return Json::object();
     }
@@ -170,6 +172,8 @@ std::string FormText(const Answer &answer)
         return "items: " + fields;
     case Answer::change:
         return "changes";
+    case Answer::own:
+        return std::string("[a document](") + answer.page + ")";
     default:
         return "";
     }

@@ -42,9 +42,11 @@ enum Trait : unsigned {
 
 // What a verb prints as JSON.
 struct Answer {
-    enum Form { nothing, one, list, document, change } form = nothing;
+    enum Form { nothing, one, list, document, change, own } form = nothing;
     std::vector<ColumnFacts> columns = {};
     std::vector<ColumnFacts> or_one = {};  // a list verb that can also show one thing
+    std::string (*schema)() = nullptr;     // of a JSON document of the verb's own
+    const char *page = "";                 // of the manual that describes it
 
     template <class Facts_, std::size_t Count>
     static Answer One(const Column<Facts_> (&columns)[Count])
@@ -67,6 +69,7 @@ struct Answer {
     {
         return {form, columns, Facts(columns_of_one)};
     }
+    static Answer Own(std::string (*schema)(), const char *page) { return {own, {}, {}, schema, page}; }
     static Answer Change() { return {change, {}, {}}; }
     static Answer Nothing() { return {nothing, {}, {}}; }
 };

@@ -5,6 +5,7 @@
 #include "frame/folder_names.h"
 #include "frame/program.h"
 #include "network/net_card.h"
+#include "network/net_document.h"
 #include "network/net_verbs.h"
 
 #include "tavo_net.h"
@@ -291,7 +292,23 @@ tavoctl net set 192.0.2.10/24 --gateway 192.0.2.1
 tavoctl net set --interface eth1 192.0.2.10/255.255.255.0
 tavoctl net set --try 60 192.0.2.20/24)",
             NetSet);
-    net.Add("confirm", changes, Answer::Change(), R"(Keeps the settings that `tavoctl net set --try` has on trial.
+    net.Add("export", reads, Answer::Own(NetDocumentSchema, "network.md"),
+            R"(Writes the whole network as a JSON document, in
+the form that apply reads.
+
+tavoctl net export
+tavoctl net export >network.json)",
+            NetExport);
+    net.Add("apply", changes, Answer::Change(),
+            R"(Brings the network to what a JSON document says. What is so already is
+not touched, and what the document does not speak of stays. When a step fails everything is as it was. --try puts
+the old network back unless it is confirmed in time.
+
+tavoctl net apply --dry-run network.json
+tavoctl net apply --try 60 network.json)",
+            NetApply);
+    net.Add("confirm", changes, Answer::Change(), R"(Keeps the settings that `tavoctl net set --try` or
+`tavoctl net apply --try` has on trial.
 
 tavoctl net confirm)",
             NetConfirm);

@@ -21,6 +21,10 @@ Given<std::optional<int64_t>> TrialOption(Arguments &in);
 Action NetSet(Arguments &in);
 Action NetConfirm(Arguments &in);
 
+// The whole network as a document.
+Action NetExport(Arguments &in);
+Action NetApply(Arguments &in);
+
 // IPv6, wake-on-LAN, bonds.
 Action NetIpv6(Arguments &in);
 Action NetWol(Arguments &in);

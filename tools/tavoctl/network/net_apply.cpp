@@ -1,0 +1,224 @@
+// tavoctl net export and apply: the whole network as one document.
+#include "frame/failure.h"
+#include "frame/held_locks.h"
+#include "frame/input_file.h"
+#include "network/net_card.h"
+#include "network/net_change.h"
+#include "network/net_present.h"
+#include "network/net_steps.h"
+#include "network/net_text.h"
+#include "network/net_verbs.h"
+
+#include "tavo_lock.h"
+#include "tavo_net.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <iostream>
+#include <set>
+
+namespace tavoctl {
+namespace {
+
+// A fact of the document that the network does not have yet, in its files or in the kernel.
+struct NetDifference {
+    std::string card;  // "" for the appliance as a whole
+    const NetItem *item;
+    Cell before, after;
+};
+
+void Compare(const std::string &card, const std::vector<NetItem> &items, const NetFactsMap &wanted,
+             const NetFactsMap *stored, const NetFactsMap *live, std::vector<NetDifference> &differences)
+{
+    for (const NetItem &item : items) {
+        const auto want = wanted.find(item.name);
+        if (want == wanted.end())
+            continue;
+        const auto find = [&](const NetFactsMap *facts) {
+            const auto found = facts ? facts->find(item.name) : NetFactsMap::const_iterator();
+            return facts && found != facts->end() ? std::optional(found->second) : std::nullopt;
+        };
+        const auto file = find(stored);
+        const auto kernel = find(live);
+        if (!file || !(*file == want->second))
+            differences.push_back({card, &item, file.value_or(Cell()), want->second});
+        else if (kernel && !(*kernel == want->second))
+            differences.push_back({card, &item, *kernel, want->second});
+    }
+}
+
+std::vector<NetDifference> DifferencesTo(const NetDocument &wanted)
+{
+    const NetDocument stored = StoredNet();
+    NetDocument live = LiveNet(stored);
+    std::vector<NetDifference> differences;
+    Compare("", net_items, wanted.net, &stored.net, &live.net, differences);
+    for (const auto &[name, card] : wanted.cards) {
+        const bool known = stored.cards.contains(name);
+        // A lease is compared with nothing, an address that shall be there with what is.
+        const std::string mode = card.contains("mode") ? TextOf(card, "mode")
+                                 : known               ? TextOf(stored.cards.at(name), "mode")
+                                                       : "none";
+        const NetFactsMap now = known ? LiveCard(name, mode) : NetFactsMap();
+        Compare(name, card_items, card, known ? &stored.cards.at(name) : nullptr, known ? &now : nullptr, differences);
+    }
+    for (const std::string &name : wanted.absent)
+        if (stored.cards.contains(name))
+            differences.push_back({name, nullptr, "there", Cell()});
+    return differences;
+}
+
+// What the document asks of interfaces that are not in it or not there.
+void RefuseUnknown(const NetDocument &wanted, const NetDocument &stored)
+{
+    const auto refuse = [](const std::string &card, const std::string &why) {
+        throw UsageFailure("take the document", "card " + card + ": " + why, "tavoctl net show lists what is there");
+    };
+    const auto is_there = [&](const std::string &name) {
+        const auto made = wanted.cards.find(name);
+        return stored.cards.contains(name) ||
+               (made != wanted.cards.end() && (made->second.contains("bond") || made->second.contains("vlan")));
+    };
+    std::set<std::string> members;
+    for (const auto &[name, card] : wanted.cards) {
+        const bool known = stored.cards.contains(name);
+        if (!is_there(name))
+            refuse(name, "there is no such interface");
+        for (const std::string &member : TextsOf(card, "members")) {
+            if (!stored.cards.contains(member) || stored.cards.at(member).contains("bond") ||
+                stored.cards.at(member).contains("vlan"))
+                refuse(name, member + " is not an Ethernet card");
+            members.insert(member);
+        }
+        if (card.contains("parent") && !is_there(TextOf(card, "parent")))
+            refuse(name, "there is no interface " + TextOf(card, "parent"));
+        if (known && card.contains("bond") && !stored.cards.at(name).contains("bond"))
+            refuse(name, "is a card and cannot become a bond");
+        if (known && card.contains("vlan") && !stored.cards.at(name).contains("vlan"))
+            refuse(name, "is a card and cannot become a VLAN");
+    }
+    for (const std::string &name : wanted.absent)
+        if (const auto card = stored.cards.find(name);
+            card != stored.cards.end() && !card->second.contains("bond") && !card->second.contains("vlan"))
+            refuse(name, "only a bond or a VLAN can be removed");
+    const std::string gateway = TextOf(wanted.net, "gateway");
+    const auto reaches = [&](const std::string &name, const NetFactsMap &facts) {
+        const auto own = wanted.cards.find(name);
+        const NetFactsMap &card = own != wanted.cards.end() && own->second.contains("mode") ? own->second : facts;
+        std::vector<std::string> all = TextsOf(card, "more_addresses");
+        all.push_back(TextOf(card, "address"));
+        return TextOf(card, "mode") == "dhcp" ||
+               std::any_of(all.begin(), all.end(), [&](const std::string &one) { return IsInNetwork(gateway, one); });
+    };
+    const auto any = [&](const std::map<std::string, NetFactsMap> &cards) {
+        return std::any_of(cards.begin(), cards.end(),
+                           [&](const auto &card) { return reaches(card.first, card.second); });
+    };
+    if (!gateway.empty() && !any(stored.cards) && !any(wanted.cards))
+        throw UsageFailure("take the document", "gateway: " + gateway + " is on the network of no card");
+}
+
+// What the start script says that it keeps over a restart of the system.
+std::set<std::string> Features()
+{
+    std::set<std::string> features;
+    std::FILE *pipe = ::popen("/etc/rc.network features 2>/dev/null", "re");
+    char line[256];
+    while (pipe && std::fgets(line, sizeof line, pipe)) {
+        std::string word = line;
+        features.insert(word.substr(0, word.find('\n')));
+    }
+    if (pipe)
+        ::pclose(pipe);
+    return features;
+}
+
+void RefuseWhatIsNotKept(const std::vector<NetDifference> &differences)
+{
+    std::optional<std::set<std::string>> features;
+    for (const NetDifference &one : differences) {
+        if (!one.item || !one.item->feature[0])
+            continue;
+        if (!features)
+            features = Features();
+        if (!features->contains(one.item->feature))
+            throw Failure{.attempted = "change " + one.card + (one.card.empty() ? "" : ".") + one.item->name,
+                          .reason = "/etc/rc.network would not keep it over a restart",
+                          .hint = "its \"features\" do not name " + std::string(one.item->feature),
+                          .status = exit_failed};
+    }
+}
+
+void RefuseUsedAddresses(const std::vector<NetDifference> &differences)
+{
+    for (const NetDifference &one : differences) {
+        const std::string name = one.item ? one.item->name : "";
+        TAVONETCARD card = {};
+        if ((name != "address" && name != "more_addresses") || TAVONetGetCard(one.card.c_str(), &card) != 0)
+            continue;
+        std::vector<std::string> wanted;
+        if (const auto *text = std::get_if<std::string>(&one.after.Get()))
+            wanted.push_back(*text);
+        if (const auto *texts = std::get_if<std::vector<std::string>>(&one.after.Get()))
+            wanted = *texts;
+        const NetFactsMap live = LiveCard(one.card, "static");
+        std::vector<std::string> own = TextsOf(live, "more_addresses");
+        own.push_back(TextOf(live, "address"));
+        const auto plain = [](const std::string &address) {
+            return address.substr(0, address.find('/'));
+        };
+        for (const std::string &address : wanted)
+            if (std::none_of(own.begin(), own.end(), [&](const auto &has) { return plain(has) == plain(address); }))
+                RefuseUsedAddress(card, plain(address));
+    }
+}
+
+void MakeChange(const NetDocument &wanted)
+{
+    // Nobody else changes the network meanwhile. The guardian needs the lock to put it back.
+    const HeldLocks lock(TAVO_LOCK_HOST, false, usual_wait);
+    ApplyNet(wanted);
+    Must(TAVONetHostsRefresh() >= 0, "bring /etc/hosts up to date");
+    if (const auto left = DifferencesTo(wanted); !left.empty()) {
+        const NetDifference &one = left.front();
+        throw Failure{.attempted = "change " + (one.card.empty() ? "the network" : one.card),
+                      .reason = std::string(one.item ? one.item->name : "it") + " is " + one.before.Text() +
+                                " after the change",
+                      .status = exit_failed};
+    }
+}
+
+}  // namespace
+
+Action NetExport(Arguments &)
+{
+    return [](Call &) {
+        const NetDocument document = StoredNet();
+        std::cout << JsonOf(document) << "\n";
+    };
+}
+
+Action NetApply(Arguments &in)
+{
+    const auto seconds = TrialOption(in);
+    const auto no_probe = in.Flag("--no-probe", no_probe_help);
+    const auto file = in.Text("FILE", file_path, "a document, or - for standard input");
+    return [=](Call &call) {
+        const NetDocument wanted = ParseNetDocument(ReadWhole(*file));
+        RefuseUnknown(wanted, StoredNet());
+        const auto differences = DifferencesTo(wanted);
+        for (const NetDifference &one : differences)
+            call.Change(one.card.empty() ? "network" : one.card, one.item ? one.item->name : "interface", one.before,
+                        one.after);
+        RefuseWhatIsNotKept(differences);
+        if (!call.Proceed())
+            return;
+        if (!*no_probe)
+            RefuseUsedAddresses(differences);
+        // A change that was cut off is no part of what this one goes back to.
+        Must(TAVONetHostsRefresh() >= 0, "finish an earlier change");
+        NetChange::Make(*seconds, [&] { MakeChange(wanted); });
+    };
+}
+
+}  // namespace tavoctl

@@ -1,0 +1,32 @@
+// The texts of a document of the network: each gives its one form, or nothing when it is not valid.
+#ifndef TAVOCTL_NET_TEXT_H
+#define TAVOCTL_NET_TEXT_H
+
+#include <optional>
+#include <string>
+
+namespace tavoctl {
+
+using NormalText = std::optional<std::string>;
+
+NormalText NormalHostname(const std::string &text);
+NormalText NormalIpv4(const std::string &text);      // of a host
+NormalText NormalIpv4Card(const std::string &text);  // "192.0.2.10/24", neither the network nor its broadcast
+NormalText NormalIpv6(const std::string &text);
+NormalText NormalIpv6Card(const std::string &text);  // "2001:db8::1/64"
+NormalText NormalServer(const std::string &text);    // IPv4 or IPv6
+NormalText NormalDomain(const std::string &text);
+NormalText NormalRoute(const std::string &text);  // "198.51.100.0/24 via 192.0.2.1"
+NormalText NormalInterface(const std::string &text);
+NormalText NormalBondMode(const std::string &text);
+NormalText NormalCardMode(const std::string &text);
+
+// The length of a mask such as 255.255.255.0.
+int LengthOfMask(const std::string &mask);
+
+// Whether the IPv4 address belongs to the network of "192.0.2.10/24".
+bool IsInNetwork(const std::string &address, const std::string &card_address);
+
+}  // namespace tavoctl
+
+#endif
