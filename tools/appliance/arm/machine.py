@@ -138,10 +138,11 @@ class _Monitor:
 class Machine:
     """with Machine(...) as machine: outcome = machine.run([...])"""
 
-    def __init__(self, image, hardware=Hardware(), share=None, cold=False, deadline=None, kept=()):
+    def __init__(self, image, hardware=Hardware(), share=None, cold=False, deadline=None, kept=(), own_programs=True):
         self.image, self.hardware, self.deadline = image, hardware, deadline
         self.share = os.path.realpath(share) if share else None
         self.kept = list(kept)
+        self.own_programs = own_programs  # this tree's, over the root
         self.cold = cold or bool(self.kept)  # a saved machine remembers what was on its disks
         self.console = b''
         self.console_to = None  # where an interactive console goes
@@ -183,7 +184,7 @@ class Machine:
     def _start(self, memory_file=None, private=True, incoming=False):
         hardware = self.hardware
         nothing = os.path.join(OWN, 'nothing')
-        programs = os.path.join(OWN, 'programs')
+        programs = os.path.join(OWN, 'programs') if self.own_programs else nothing
         for directory in (nothing, programs):
             os.makedirs(directory, exist_ok=True)
         inherited = []

@@ -9,6 +9,8 @@
 
 #include <algorithm>
 
+#include <sys/stat.h>
+
 namespace tavoctl {
 
 int NumberOf(const std::string &partition)
@@ -43,6 +45,19 @@ int FlagsOf(bool system, bool data, const std::string &attempted)
     return system ? PARTITION_SYSTEM : PARTITION_DATA;
 }
 
+// Other systems have another tool of this name, so an installation keeps the appliance's own in a folder of its own.
+void RequireTool(const std::string &attempted)
+{
+    constexpr const char *kTool = "/sbin/sfdisk";
+    struct stat in_place = {}, installed = {};
+    const bool missing = ::stat(kTool, &in_place) != 0;
+    const bool aside = ::stat("/usr/lib/tavo-appliance/sfdisk", &installed) == 0;
+    if (missing || (aside && (in_place.st_ino != installed.st_ino || in_place.st_dev != installed.st_dev)))
+        throw Failure{.attempted = attempted,
+                      .reason = std::string(kTool) + (missing ? " is missing" : " is not the appliance's own tool"),
+                      .hint = "run tavo-appliance-setup, of the package tavo-appliance"};
+}
+
 std::vector<std::string> DataPartitions(const std::string &disk)
 {
     std::vector<std::string> partitions = PartitionsOf(disk);
@@ -60,6 +75,7 @@ Action PartitionMake(Arguments &in)
     const auto version =
         in.Number("--version", "VERSION", "of the layout; 0: the one that the system carries (0)", 0, 99);
     return [=](Call &call) {
+        RequireTool("make partitions on " + Joined(*words, ", "));
         std::vector<std::string> paths;
         for (const std::string &word : *words)
             paths.push_back(DiskPath(word));
@@ -101,6 +117,7 @@ Action PartitionErase(Arguments &in)
     const auto data = in.Flag("--data", "partitions 3 to 15");
     const auto table = in.Flag("--table", "the table alone");
     return [=](Call &call) {
+        RequireTool("clean " + *disk);
         const std::string path = DiskPath(*disk);
         const std::string attempted = "clean " + path;
         if (*table && (*system || *data))
