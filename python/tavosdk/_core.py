@@ -61,6 +61,11 @@ def call(name: str, *arguments: Any, fails: Callable[[Any], bool] | None = None)
         return result
 
 
+def below_one(result: int) -> bool:
+    """Whether a function failed that returns 0 where nothing was found or changed."""
+    return result <= 0
+
+
 def quietly(name: str, *arguments: Any) -> tuple[Any, Error | None]:
     """The result of a function and what it recorded, without judging either."""
     with _one_call:

@@ -3,7 +3,8 @@ from __future__ import annotations
 
 import dataclasses
 
-from ._core import c_names, call, ffi, lib, text, wraps
+from ._core import c_names, call, lib, text, wraps
+from ._owned import record
 
 __getattr__, __dir__ = c_names("appliance", globals())
 
@@ -23,10 +24,7 @@ def bays() -> int:
 
 @wraps("TAVOEBoxInfoEnum")
 def expansion_units() -> list[ExpansionUnit]:
-    cell = ffi.new("TAVOEBOX **")
-    try:
+    with record("TAVOEBOX", "free") as cell:
         count = call("TAVOEBoxInfoEnum", cell)
         return [ExpansionUnit(box.iUnit, box.iPort, bool(box.fPoweron),
                               [text(box.rgszDisk[place]) for place in range(box.nDisk)]) for box in cell[0][0:count]]
-    finally:
-        lib.free(cell[0])

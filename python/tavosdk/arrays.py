@@ -5,6 +5,7 @@ import dataclasses
 import enum
 
 from ._core import NotFoundError, c_names, call, ffi, lib, text, wraps
+from ._owned import chain, record
 
 __getattr__, __dir__ = c_names("raid", globals())
 
@@ -50,39 +51,26 @@ class Array:
     members: list[Member]
 
 
-def _from_c(record: ffi.CData) -> Array:
-    members, member = [], record.pMembers
-    while member != ffi.NULL:
-        members.append(Member(text(member.szPath), State(member.nState)))
-        member = member.pNext
-    return Array(text(record.szPath), Level(record.fLevel), Status(record.nStatus), bool(record.fRebuilding),
-                 record.cbArray, record.nSlot, record.nWorking, record.nFailed, members)
+def _from_c(info: ffi.CData) -> Array:
+    return Array(text(info.szPath), Level(info.fLevel), Status(info.nStatus), bool(info.fRebuilding), info.cbArray,
+                 info.nSlot, info.nWorking, info.nFailed,
+                 [Member(text(member.szPath), State(member.nState)) for member in chain(info.pMembers)])
 
 
 @wraps("RAIDInfoGet")
 def get(path: str) -> Array:
     """The array of this path; NotFoundError when there is none or it does not run."""
-    cell = ffi.new("RAIDINFO **")
-    try:
+    with record("RAIDINFO", "RAIDInfoFree") as cell:
         if call("RAIDInfoGet", path, cell) == 0:
             raise NotFoundError(f"no array at {path}", lib.ERR_PATH_NOT_FOUND)
         return _from_c(cell[0])
-    finally:
-        lib.RAIDInfoFree(cell[0])
 
 
 @wraps("RAIDInfoEnum")
 def all() -> list[Array]:
-    cell = ffi.new("RAIDLIST **")
-    try:
+    with record("RAIDLIST", "RAIDListFree") as cell:
         call("RAIDInfoEnum", cell)
-        found, node = [], cell[0]
-        while node != ffi.NULL:
-            found.append(_from_c(node.pInfo))
-            node = node.pNext
-        return found
-    finally:
-        lib.RAIDListFree(cell[0])
+        return [_from_c(node.pInfo) for node in chain(cell[0])]
 
 
 @wraps("RAIDRebuildingWait")

@@ -4,6 +4,7 @@ from __future__ import annotations
 import dataclasses
 
 from ._core import NotFoundError, c_names, call, ffi, lib, text, wraps
+from ._owned import chain, record
 
 __getattr__, __dir__ = c_names("disk", globals())
 
@@ -18,36 +19,26 @@ class Disk:
     unit: int                 #: the expansion unit, 0 for an internal bay
 
 
-def _from_c(record: ffi.CData) -> Disk:
-    return Disk(text(record.szPath), text(record.szModel).rstrip(), record.cbDisk,
-                None if record.nTemperature < 0 else record.nTemperature, record.iDisk, record.iUnit)
+def _from_c(info: ffi.CData) -> Disk:
+    return Disk(text(info.szPath), text(info.szModel).rstrip(), info.cbDisk,
+                None if info.nTemperature < 0 else info.nTemperature, info.iDisk, info.iUnit)
 
 
 @wraps("DiskInfoGet")
 def get(path: str) -> Disk:
     """The disk that this path, or that of one of its partitions, names; NotFoundError for an empty bay."""
-    cell = ffi.new("DISKINFO **")
-    try:
+    with record("DISKINFO", "DiskInfoFree") as cell:
         if call("DiskInfoGet", path, cell) == 0:
             raise NotFoundError(f"no disk at {path}", lib.ERR_FILE_NOT_FOUND)
         return _from_c(cell[0])
-    finally:
-        lib.DiskInfoFree(cell[0])
 
 
 @wraps("DiskInfoEnum")
 def all() -> list[Disk]:
     """The disks of all bays and of all expansion units that have power."""
-    cell = ffi.new("DISKLIST **")
-    try:
+    with record("DISKLIST", "DiskInfoEnumFree") as cell:
         call("DiskInfoEnum", None, cell)
-        found, node = [], cell[0]
-        while node != ffi.NULL:
-            found.append(_from_c(node.pInfo))
-            node = node.pNext
-        return found
-    finally:
-        lib.DiskInfoEnumFree(cell[0])
+        return [_from_c(node.pInfo) for node in chain(cell[0])]
 
 
 @wraps("TAVODiskTemperatureGet")

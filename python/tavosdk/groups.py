@@ -3,7 +3,8 @@ from __future__ import annotations
 
 import dataclasses
 
-from ._core import Error, Texts, c_names, call, ffi, lib, quietly, string, text, text_of, to_c, wraps
+from ._core import Error, Texts, c_names, call, lib, quietly, string, text, text_of, to_c, wraps
+from ._owned import record
 from .lists import taken
 
 __getattr__, __dir__ = c_names("group", globals())
@@ -18,15 +19,12 @@ class Group:
 
 
 def _get(function: str, key: str | int) -> Group:
-    cell = ffi.new("TAVOGROUP **")
-    try:
+    with record("TAVOGROUP", "TAVOGroupFree") as cell:
         call(function, key, cell)
-        record, members = cell[0], []
-        while (member := string(record.rgszMember[len(members)])) is not None:
+        group, members = cell[0], []
+        while (member := string(group.rgszMember[len(members)])) is not None:
             members.append(member)
-        return Group(text(record.szName), record.nGid, members, description(text(record.szName)))
-    finally:
-        lib.TAVOGroupFree(cell[0])
+        return Group(text(group.szName), group.nGid, members, description(text(group.szName)))
 
 
 @wraps("TAVOGroupGet", "TAVOGroupDescGet")
@@ -59,12 +57,10 @@ def description(name: str) -> str:
 @wraps("TAVOGroupSet", "TAVOGroupDescSet")
 def set(group: Group, old_name: str | None = None) -> Group:
     """Adds the group, or makes the one called old_name what `group` says. Returns it as it is stored."""
-    cell, given = ffi.new("TAVOGROUP **"), Texts(group.members)
-    try:
+    given = Texts(group.members)
+    with record("TAVOGROUP", "TAVOGroupFree") as cell:
         call("TAVOGroupAlloc2", cell, group.name, group.gid, given.array)
         call("TAVOGroupSet", old_name, cell[0])
-    finally:
-        lib.TAVOGroupFree(cell[0])
     if group.description != description(group.name):
         call("TAVOGroupDescSet", group.name, group.description)
     return get(group.name)

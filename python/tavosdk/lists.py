@@ -4,42 +4,22 @@ from __future__ import annotations
 from collections.abc import Iterable, Iterator, MutableSequence
 from typing import Any
 
-from ._core import c_names, call, ffi, lib, quietly, text, to_c, wraps
+from ._core import c_names, call, lib, quietly, text, wraps
+from ._owned import Block, filled
 
 __all__ = ["StringList"]
 __getattr__, __dir__ = c_names("list", globals())
 
 
-class StringList(MutableSequence[str]):
-    """A list of texts in the library's memory, which this object frees. `cell` is what functions take that may move it
-    (TLIBSZLIST **), `pointer` what the others take. A list that was closed is empty and refuses changes."""
+class StringList(Block, MutableSequence[str]):
+    """A list of texts in the library's memory, which this object frees. `cell` is for functions that may move it
+    (TLIBSZLIST **), `pointer` for the others. A closed list is empty and refuses changes."""
+
+    _allocates, _frees, _type = "PslTLIBSzListAlloc", "TLIBSzListFree", "TLIBSZLIST"
 
     def __init__(self, items: Iterable[str] = (), size: int = 512):
-        self.cell = ffi.new("TLIBSZLIST **", call("PslTLIBSzListAlloc", size))
+        super().__init__(size)
         self.extend(items)
-
-    @property
-    def pointer(self) -> Any:
-        if not self.open:
-            raise ValueError("the list was closed")
-        return self.cell[0]
-
-    @property
-    def open(self) -> bool:
-        return getattr(self, "cell", None) is not None and self.cell[0] != ffi.NULL
-
-    def close(self) -> None:
-        if self.open:
-            lib.TLIBSzListFree(self.cell[0])
-            self.cell[0] = ffi.NULL
-
-    __del__ = close
-
-    def __enter__(self) -> StringList:
-        return self
-
-    def __exit__(self, *_: object) -> None:
-        self.close()
 
     def __len__(self) -> int:
         return self.pointer.nItem if self.open else 0
@@ -56,7 +36,7 @@ class StringList(MutableSequence[str]):
         return text(lib.SzTLIBSzListGet(self.pointer, self._index(index)))
 
     def __setitem__(self, index: Any, value: Any) -> None:
-        call("TLIBSzListSet", self.cell, self._index(index), value)
+        call("TLIBSzListSet", self.open_cell, self._index(index), value)
 
     def __delitem__(self, index: Any) -> None:
         lib.SzTLIBSzListRemove(self.pointer, self._index(index))
@@ -66,11 +46,7 @@ class StringList(MutableSequence[str]):
         """Inserts before index; a sorted list has a place of its own for it."""
         count = len(self)
         index = max(index + count, 0) if index < 0 else min(index, count)
-        call("TLIBSzListInsert", self._open_cell(), index, value)
-
-    def _open_cell(self) -> Any:
-        assert self.pointer is not None
-        return self.cell
+        call("TLIBSzListInsert", self.open_cell, index, value)
 
     @wraps("TLIBSzListSortItems")
     def sort(self, ignore_case: bool = False) -> None:
@@ -104,7 +80,5 @@ class StringList(MutableSequence[str]):
 def taken(function: str, *arguments: Any, place: int | None = None) -> list[str]:
     """The texts that a function appends to a list; `place` is where it takes the list among its arguments."""
     with StringList() as into:
-        given = list(arguments)
-        given.insert(len(given) if place is None else place, into.cell)
-        call(function, *[to_c(argument) for argument in given])
+        filled(into, function, arguments, place)
         return list(into)

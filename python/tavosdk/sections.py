@@ -3,7 +3,7 @@ from __future__ import annotations
 
 from collections.abc import Mapping
 
-from ._core import c_names, call, wraps
+from ._core import below_one, c_names, call, wraps
 from .hashes import StringHash, taken
 from .lists import taken as taken_list
 from .settings import Path
@@ -32,9 +32,9 @@ def add(path: Path, section: str, pairs: Mapping[str, str]) -> None:
 def set(path: Path, section: str, pairs: Mapping[str, str], new_name: str | None = None) -> None:
     """Replaces a section that exists."""
     with StringHash(pairs) as given:
-        call("ErrTLIBFileSetSection", path, section, new_name, given.pointer, 1, None, fails=lambda result: result <= 0)
+        call("ErrTLIBFileSetSection", path, section, new_name, given.pointer, 1, None, fails=below_one)
 
 
 @wraps("ErrTLIBFileRemoveSection")
 def remove(path: Path, section: str) -> None:
-    call("ErrTLIBFileRemoveSection", path, section, fails=lambda result: result <= 0)
+    call("ErrTLIBFileRemoveSection", path, section, fails=below_one)

@@ -4,7 +4,7 @@ from __future__ import annotations
 import os
 from collections.abc import Iterator, Mapping, MutableMapping
 
-from ._core import NotFoundError, c_names, call, text_of, wraps
+from ._core import NotFoundError, below_one, c_names, call, text_of, wraps
 from .hashes import StringHash
 from .lists import taken as taken_list
 
@@ -16,15 +16,11 @@ SYSTEM, FACTORY = "/etc/tavoinfo.conf", "/etc.defaults/tavoinfo.conf"
 Path = str | os.PathLike[str]
 
 
-def _below_one(result: int) -> bool:
-    return result <= 0
-
-
 @wraps("TLIBFileGetKeyValue")
 def get(path: Path, key: str, default: str | None = None) -> str | None:
     """The value of the key; default where no line sets it."""
     try:
-        return text_of("TLIBFileGetKeyValue", path, key, room=256, after=(0,), fails=_below_one)
+        return text_of("TLIBFileGetKeyValue", path, key, room=256, after=(0,), fails=below_one)
     except NotFoundError as error:
         if error.name != "ERR_KEY_NOT_FOUND":
             raise
@@ -45,7 +41,7 @@ def update(path: Path, pairs: Mapping[str, str]) -> None:
 
 @wraps("TLIBFileRemoveKey")
 def remove(path: Path, key: str) -> None:
-    call("TLIBFileRemoveKey", path, key, fails=_below_one)
+    call("TLIBFileRemoveKey", path, key, fails=below_one)
 
 
 @wraps("TLIBFileGetKeys")

@@ -5,6 +5,7 @@ import dataclasses
 import datetime
 
 from ._core import Error, Texts, c_names, call, ffi, lib, quietly, text, to_c, wraps
+from ._owned import record
 from .lists import taken
 
 __getattr__, __dir__ = c_names("user", globals())
@@ -36,36 +37,23 @@ def _days(day: datetime.date | None) -> int:
     return -1 if day is None else (day - _EPOCH).days
 
 
-def _from_c(record: ffi.CData) -> User:
-    return User(text(record.szName), record.nUid, record.nGid, text(record.szDesc), text(record.szHome),
-                text(record.szShell), text(record.szMail),
-                None if record.nExpired < 0 else _EPOCH + datetime.timedelta(record.nExpired),
-                not record.fCannotChgPasswd, record.nPrivilege, text(record.szPasswd),
-                record.nKind == lib.TAVO_USER_KIND_DOMAIN)
-
-
-class _Record:
-    """A record of the library, freed at the end of its block."""
-
-    def __enter__(self) -> ffi.CData:
-        self._cell = ffi.new("TAVOUSER **")
-        return self._cell
-
-    def __exit__(self, *_: object) -> None:
-        lib.TAVOUserFree(self._cell[0])
+def _from_c(user: ffi.CData) -> User:
+    return User(text(user.szName), user.nUid, user.nGid, text(user.szDesc), text(user.szHome), text(user.szShell),
+                text(user.szMail), None if user.nExpired < 0 else _EPOCH + datetime.timedelta(user.nExpired),
+                not user.fCannotChgPasswd, user.nPrivilege, text(user.szPasswd), user.nKind == lib.TAVO_USER_KIND_DOMAIN)
 
 
 @wraps("TAVOUserGet")
 def get(name: str) -> User:
     """The account of this name, in any case of letters; NotFoundError when there is none."""
-    with _Record() as cell:
+    with record("TAVOUSER", "TAVOUserFree") as cell:
         call("TAVOUserGet", name, cell)
         return _from_c(cell[0])
 
 
 @wraps("TAVOUserGetByUID")
 def get_by_uid(uid: int) -> User:
-    with _Record() as cell:
+    with record("TAVOUSER", "TAVOUserFree") as cell:
         call("TAVOUserGetByUID", uid, cell)
         return _from_c(cell[0])
 
@@ -86,7 +74,7 @@ def all() -> list[User]:
 
 
 def _set(old: str | None, user: User, password: str) -> None:
-    with _Record() as cell:
+    with record("TAVOUSER", "TAVOUserFree") as cell:
         call("TAVOUserAlloc", cell, user.name, password, user.uid, user.gid, user.description, user.home, user.shell,
              _days(user.expires), not user.may_change_password, user.mail, user.privilege)
         # The library skips an entry that it refuses, returns 0, and leaves the code.

@@ -3,7 +3,8 @@ from __future__ import annotations
 
 import dataclasses
 
-from ._core import NotFoundError, c_names, call, ffi, lib, text, text_of, wraps
+from ._core import NotFoundError, c_names, call, lib, text, text_of, wraps
+from ._owned import chain, record
 
 __getattr__, __dir__ = c_names("lvm", globals())
 
@@ -22,16 +23,9 @@ def supported() -> bool:
 
 @wraps("LVMPvSBEnum")
 def physical_volumes() -> list[PhysicalVolume]:
-    cell = ffi.new("LVMPVLIST **")
-    try:
+    with record("LVMPVLIST", "LVMPvSBListFree") as cell:
         call("LVMPvSBEnum", cell)
-        found, node = [], cell[0]
-        while node != ffi.NULL:
-            found.append(PhysicalVolume(text(node.pv.szPv), text(node.pv.szVg), text(node.pv.szUuid)))
-            node = node.pNext
-        return found
-    finally:
-        lib.LVMPvSBListFree(cell[0])
+        return [PhysicalVolume(text(node.pv.szPv), text(node.pv.szVg), text(node.pv.szUuid)) for node in chain(cell[0])]
 
 
 @wraps("LVMGetLVPath")

@@ -32,11 +32,16 @@ class Leaks(unittest.TestCase):
         self.assertEqual(len(found), 1, run.stderr)
 
     def test_the_modules_free_what_they_were_given(self):
-        found, run = leaks(str(here / "module_test.py"), "Accounts", "Files", "Memory",
-                           "Failures.test_a_failure_has_its_code_and_place")
-        self.assertEqual(run.returncode, 0, run.stderr[:3000])
-        self.assertIn("LeakSanitizer", run.stderr)
-        self.assertEqual(found, [])
+        for program, *cases in (("module_test.py", "Accounts", "Files", "Memory",
+                                 "Failures.test_a_failure_has_its_code_and_place"),
+                                ("families_test.py", "Conversions", "Records", "Accounts",
+                                 "Lives.test_a_child_process_has_its_own_copies",
+                                 "Lives.test_a_list_that_cannot_be_filled_is_freed")):
+            with self.subTest(program):
+                found, run = leaks(str(here / program), *cases)
+                self.assertEqual(run.returncode, 0, run.stderr[:3000])
+                self.assertIn("LeakSanitizer", run.stderr)
+                self.assertEqual(found, [])
 
 
 if __name__ == "__main__":
