@@ -14,7 +14,9 @@
 #include <memory>
 #include <optional>
 #include <random>
+#include <sstream>
 
+#include <fcntl.h>
 #include <netinet/in.h>
 #include <sys/socket.h>
 
@@ -453,14 +455,57 @@ TEST_F(Net, DiscoverListsWhoAnswers)
         const Ran found = Tavoctl({"discover", "--json"});
         EXPECT_EQ(found.status, 0) << found;
         EXPECT_THAT(found.out, AllOf(HasSubstr(R"("name": "there")"), HasSubstr(R"("address": "192.0.2.99")")));
-        // In a pipe, watching says what has changed: once, as nothing does. Asked to end, it ends when it has looked.
-        RunningTavoctl watch({"discover", "--watch"});
-        ::usleep(500000);
-        ::kill(watch.Pid(), SIGTERM);
-        const Ran watched = watch.Wait();
-        EXPECT_EQ(watched.status, 0) << watched;
         return true;
     }));
+    // A stream of what happens: a host that is there, has another name, and leaves.
+    int renamed[2];
+    ASSERT_EQ(::pipe2(renamed, O_CLOEXEC), 0);
+    const pid_t neighbour = ::fork();
+    if (neighbour == 0) {
+        char byte;
+        (void)!::read(renamed[0], &byte, 1);
+        there_->Shell("hostname attic");
+        (void)!::read(renamed[0], &byte, 1);
+        there_->Shell("kill $(cat /var/run/findhostd.pid)");
+        ::_exit(0);
+    }
+    EXPECT_TRUE(here_->Run([&] {
+        test::ShellStatus("tavoctl discover --watch --json >/tmp/stream 2>&1 & echo $! >/tmp/watcher");
+        const auto lines = [] {
+            std::vector<nlohmann::json> events;
+            std::istringstream in(ReadFile("/tmp/stream"));
+            for (std::string line; std::getline(in, line);) {
+                nlohmann::json event = nlohmann::json::parse(line, nullptr, false);
+                EXPECT_TRUE(event.is_object()) << line;
+                if (event.is_object() && event.at("address") == "192.0.2.99")
+                    events.push_back(event);
+            }
+            return events;
+        };
+        const auto comes = [&](std::size_t count) {
+            for (int i = 0; i < 700 && lines().size() < count; ++i)
+                ::usleep(100000);
+            return lines().size() == count;
+        };
+        EXPECT_TRUE(comes(1));
+        EXPECT_EQ(lines().at(0), nlohmann::json({{"format_version", 1},
+                                                 {"event", "arrived"},
+                                                 {"name", "there"},
+                                                 {"address", "192.0.2.99"},
+                                                 {"old_name", nullptr}}));
+        EXPECT_EQ(::write(renamed[1], "r", 1), 1);
+        EXPECT_TRUE(comes(2));
+        EXPECT_EQ(lines().at(1).at("event"), "changed");
+        EXPECT_EQ(lines().at(1).at("name"), "attic");
+        EXPECT_EQ(lines().at(1).at("old_name"), "there");
+        EXPECT_EQ(::write(renamed[1], "l", 1), 1);
+        EXPECT_TRUE(comes(3));
+        EXPECT_EQ(lines().at(2).at("event"), "departed");
+        EXPECT_EQ(test::ShellStatus("kill $(cat /tmp/watcher)"), 0);
+        return !HasFailure();
+    }));
+    ::waitpid(neighbour, nullptr, 0);
+    ASSERT_EQ(there_->Shell("/usr/tavo/bin/findhostd"), 0);
     VirtualCable second("second");
     second.Plug(*here_, "eth1");
     EXPECT_TRUE(here_->Run([] {
