@@ -1,3 +1,8 @@
+# What tavoctl reads from pages of bytes is tested without a drive.
+set(tavoctl_folder ${PROJECT_SOURCE_DIR}/tools/tavoctl)
+target_sources(tools_tavoctl_test PRIVATE ${tavoctl_folder}/storage/smart_pages.cpp)
+set_source_files_properties(${tavoctl_folder}/storage/smart_pages.cpp PROPERTIES SKIP_PRECOMPILE_HEADERS ON)
+target_include_directories(tools_tavoctl_test PRIVATE ${tavoctl_folder})
 target_link_libraries(tools_tavoctl_test PRIVATE crypt)
 
 # The texts that go with tavoctl are for the machine of whoever builds it; the program only prints here.

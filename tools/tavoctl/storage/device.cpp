@@ -20,6 +20,7 @@
 
 #include <fcntl.h>
 #include <sys/stat.h>
+#include <sys/utsname.h>
 #include <unistd.h>
 
 namespace tavoctl {
@@ -211,6 +212,24 @@ void RefuseToWakeAny(bool wake, const std::string &attempted)
         if (PowerOf(disk) == Power::standby)
             RefuseToWake(disk, false, attempted);
     }
+}
+
+void RefuseTooLarge(uint64_t size, const std::string &attempted)
+{
+    constexpr uint64_t most = uint64_t{1} << 44;  // 2^32 pages of 4 KiB
+    struct utsname system;
+    const std::string machine = ::uname(&system) == 0 ? system.machine : "";
+    const bool narrow = sizeof(void *) == 4 && !machine.ends_with("64");
+    if (narrow && size > most)
+        throw Failure{.attempted = attempted,
+                      .reason = "larger than the 16 TiB of one device that this system can reach",
+                      .hint = "use several smaller ones"};
+}
+
+uint64_t SizeOfDevice(const std::string &path)
+{
+    uint64_t sectors = 0;
+    return DiskSizeGet(path.c_str(), &sectors) == 1 ? sectors * 512 : 0;
 }
 
 std::optional<std::string> KernelText(const std::string &path)

@@ -8,6 +8,7 @@
 
 #include "tavo_disk.h"
 
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -63,6 +64,10 @@ std::string UseOf(const std::string &device);
 
 // Throws a Failure when a device is in use, or is none.
 void RefuseUsed(const std::vector<std::string> &devices, const std::string &attempted);
+
+// A 32-bit kernel reaches 16 TiB of one device: throws a Failure when a device of so many bytes is larger.
+void RefuseTooLarge(uint64_t size, const std::string &attempted);
+uint64_t SizeOfDevice(const std::string &path);  // bytes; 0 when it cannot be read
 
 // The first line of a file of the kernel's.
 std::optional<std::string> KernelText(const std::string &path);

@@ -5,6 +5,7 @@
 #include "storage/arrays.h"
 #include "storage/device.h"
 #include "storage/disk_facts.h"
+#include "storage/disk_verbs.h"
 #include "storage/smart.h"
 
 namespace tavoctl {
@@ -236,6 +237,21 @@ is given.
 tavoctl disk smart sda
 tavoctl disk smart --wake --json sdb)",
              DiskSmart);
+    disk.Add("health", reads, Answer::List(health_columns), R"(Gives one verdict on each disk, with its reason: good;
+worn, which is to be replaced soon (sectors could not be read, or had to be replaced); failing (an attribute has reached
+its threshold, or a self-test failed), with exit status 1. A disk in standby is not read unless --wake is given.
+
+tavoctl disk health
+tavoctl disk health --json sda sdb)",
+             DiskHealthList);
+    disk.Add("test", changes, Answer::Change(),
+             R"(Starts the drive's own test, which goes on in the background while the
+disk is used. `disk health` shows how far it is and what came of it.
+
+tavoctl disk test --short sda
+tavoctl disk test --long --wait sda
+tavoctl disk test --stop sda)",
+             DiskTest);
     disk.Add("temperature", reads, Answer::One(temperature_columns), R"(Prints the temperature of a disk in degrees
 Celsius. A disk in standby is not read unless --wake is given.
 

@@ -113,6 +113,10 @@ Action LvmCreate(Arguments &in)
             throw Failure{.attempted = attempted, .reason = "it is there already"};
         RefuseUsed(paths, attempted);
         RefuseGrouped(paths, attempted);
+        uint64_t size = 0;
+        for (const std::string &device : paths)
+            size += SizeOfDevice(device);
+        RefuseTooLarge(size, attempted);
         call.Change(path, "devices", {}, paths);
         call.Change(path, "volume", {}, volume->value_or("lv"));
         if (call.Proceed("Lose what is on " + Joined(paths, ", ") + "?"))

@@ -3,6 +3,7 @@
 
 #include "frame/folder_names.h"
 #include "storage/device.h"
+#include "storage/smart_pages.h"
 
 #include <algorithm>
 
@@ -41,28 +42,6 @@ std::string WithoutBlanks(std::string text)
 }
 
 }  // namespace
-
-std::optional<NvmeHealth> ParseNvmeHealth(const unsigned char (&page)[page_size])
-{
-    constexpr int zero_celsius = 273;
-    constexpr struct {
-        int bit;
-        const char *text;
-    } warnings[] = {
-        {0x01, "its spare blocks run out"},
-        {0x02, "it is too hot or too cold"},
-        {0x04, "it is no longer reliable"},
-        {0x08, "it can only be read"},
-        {0x10, "its cache is not saved when the power fails"},
-    };
-    const int kelvin = page[1] | page[2] << 8;
-    if (kelvin == 0)
-        return std::nullopt;
-    for (const auto &[bit, text] : warnings)
-        if (page[0] & bit)
-            return NvmeHealth{kelvin - zero_celsius, std::string("failing: ") + text};
-    return NvmeHealth{kelvin - zero_celsius, "good"};
-}
 
 std::vector<NvmeDisk> NvmeDisks()
 {

@@ -19,13 +19,6 @@ struct NvmeDisk {
 
 std::vector<NvmeDisk> NvmeDisks();
 
-// What the drive's health log says; nothing for a page that is none.
-struct NvmeHealth {
-    int temperature;  // degrees Celsius
-    std::string text;
-};
-std::optional<NvmeHealth> ParseNvmeHealth(const unsigned char (&page)[512]);
-
 }  // namespace tavoctl
 
 #endif

@@ -95,6 +95,7 @@ Action PartitionMake(Arguments &in)
         if (empties)
             RefuseUsed(paths, attempted);
         for (const std::string &path : paths) {
+            RefuseTooLarge(SizeOfDevice(path), attempted);
             if (!empties && PartitionsOf(path).size() > 2)
                 throw Failure{
                     .attempted = attempted, .reason = path + " has a data partition", .hint = "clean it first"};

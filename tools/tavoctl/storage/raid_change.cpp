@@ -37,6 +37,26 @@ void RefuseTwice(std::vector<std::string> paths, const std::string &attempted)
         throw UsageFailure(attempted, *twice + " is named twice");
 }
 
+// How large an array of these members will be, at most.
+uint64_t SizeToBe(int level, const std::vector<std::string> &paths, int slots, uint64_t limit)
+{
+    uint64_t least = limit ? limit : ~uint64_t{0};
+    uint64_t sum = 0;
+    for (const std::string &path : paths) {
+        least = std::min(least, SizeOfDevice(path));
+        sum += SizeOfDevice(path);
+    }
+    switch (level) {
+    case RAID_LEVEL_0:
+    case RAID_LEVEL_LINEAR:
+        return sum;
+    case RAID_LEVEL_10:
+        return least * static_cast<uint64_t>(slots) / 2;
+    default:
+        return least * static_cast<uint64_t>(slots - RAIDParityDiskCount(level, slots));
+    }
+}
+
 void RefuseUsedArray(const std::string &path, const std::string &attempted)
 {
     if (const std::string use = UseOf(path); !use.empty())
@@ -64,19 +84,22 @@ Action RaidCreate(Arguments &in)
         if (IsRunning(path))
             throw BusyFailure(attempted, "it runs", "stop it first");
         RefuseUsed(paths, attempted);
+        const auto spare = static_cast<int>(spares->value_or(0));
+        const int active = std::max(static_cast<int>(paths.size()) - spare, 1);
+        const auto slot_count = static_cast<int>(slots->value_or(active));
+        const uint64_t member_size = static_cast<uint64_t>(size->value_or(0)) << 20;
+        RefuseTooLarge(SizeToBe(*LevelOf(**level), paths, slot_count, member_size), attempted);
         call.Change(path, "level", {}, LevelText(*LevelOf(**level)));
         call.Change(path, "members", {}, paths);
         if (!call.Proceed(LossOf(paths)))
             return;
         const StringList members(paths);
-        const auto spare = static_cast<int>(spares->value_or(0));
-        const int active = std::max(static_cast<int>(paths.size()) - spare, 1);
         const RAIDREQUEST request = {.szPath = path.c_str(),
                                      .pVersion = nullptr,
                                      .fLevel = *LevelOf(**level),
                                      .nSpare = spare,
-                                     .nSlot = static_cast<int>(slots->value_or(active)),
-                                     .cbArray = static_cast<uint64_t>(size->value_or(0)) << 20,
+                                     .nSlot = slot_count,
+                                     .cbArray = member_size,
                                      .pslMembers = members.Get(),
                                      .fSync = *no_sync ? 0 : 1};
         Must(RAIDCreate(&request) == 0, attempted, log_hint);

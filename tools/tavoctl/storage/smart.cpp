@@ -15,22 +15,6 @@ constexpr int slots = 30;
 constexpr int slot_size = 12;
 constexpr int first_slot = 2;
 
-struct Name {
-    int id;
-    const char *name;
-};
-
-constexpr Name names[] = {
-    {1, "read error rate"},         {3, "spin-up time"},           {4, "starts and stops"},
-    {5, "reallocated sectors"},     {7, "seek error rate"},        {9, "power-on hours"},
-    {10, "spin-up retries"},        {12, "power cycles"},          {173, "wear leveling"},
-    {184, "end-to-end errors"},     {187, "uncorrectable errors"}, {188, "command timeouts"},
-    {190, "airflow temperature"},   {192, "emergency retracts"},   {193, "load cycles"},
-    {194, "temperature"},           {196, "reallocation events"},  {197, "pending sectors"},
-    {198, "offline uncorrectable"}, {199, "interface CRC errors"}, {241, "sectors written"},
-    {242, "sectors read"},
-};
-
 bool ReadThresholds(const std::string &disk, unsigned char (&page)[page_size])
 {
     const int fd = TAVOIDiskRawOpen(disk.c_str());
@@ -80,15 +64,6 @@ std::vector<SmartAttribute> ReadSmart(const std::string &disk, const std::string
                               Raw(slot + 5, slot[0])});
     }
     return attributes;
-}
-
-const char *SmartName(int id)
-{
-    for (const Name &known : names) {
-        if (known.id == id)
-            return known.name;
-    }
-    return "";
 }
 
 }  // namespace tavoctl

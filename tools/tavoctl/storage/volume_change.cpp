@@ -15,33 +15,17 @@
 
 #include <sys/mount.h>
 #include <sys/stat.h>
-#include <sys/utsname.h>
 
 namespace tavoctl {
 namespace {
 
 constexpr char volume_name[] = "lv";
-constexpr uint64_t most_32_bit = uint64_t{1} << 44;  // 2^32 pages of 4 KiB
-
-// A 32-bit kernel cannot reach what is beyond that.
-void RefuseTooLarge(uint64_t size, const std::string &attempted)
-{
-    struct utsname system;
-    const std::string machine = ::uname(&system) == 0 ? system.machine : "";
-    if (size > most_32_bit && sizeof(void *) == 4 && !machine.ends_with("64"))
-        throw Failure{.attempted = attempted,
-                      .reason = "it would be larger than the 16 TiB that this system can reach",
-                      .hint = "make several volumes"};
-}
 
 uint64_t SizeOfAll(const std::vector<std::string> &paths)
 {
     uint64_t size = 0;
-    for (const std::string &path : paths) {
-        uint64_t sectors = 0;
-        if (DiskSizeGet(path.c_str(), &sectors) == 1)
-            size += sectors * 512;
-    }
+    for (const std::string &path : paths)
+        size += SizeOfDevice(path);
     return size;
 }
 

@@ -1,0 +1,141 @@
+// tavoctl disk: the verdict on a drive, and its self-tests.
+#include "frame/failure.h"
+#include "frame/progress.h"
+#include "storage/device.h"
+#include "storage/disk_verbs.h"
+#include "storage/smart_pages.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <chrono>
+#include <thread>
+
+#include <linux/hdreg.h>
+#include <sys/ioctl.h>
+#include <unistd.h>
+
+namespace tavoctl {
+namespace {
+
+constexpr unsigned char short_test = 1;
+constexpr unsigned char long_test = 2;
+constexpr unsigned char stop_test = 127;
+
+void ReadPage(const std::string &disk, unsigned char (&page)[512], const std::string &attempted)
+{
+    if (SmartDataRead(disk.c_str(), page, 0) != 0)
+        throw Failure{.attempted = attempted, .reason = "the drive does not give its SMART data"};
+}
+
+SelfTest ReadSelfTest(const std::string &disk, const std::string &attempted)
+{
+    unsigned char page[512] = {};
+    ReadPage(disk, page, attempted);
+    return ParseSelfTest(page);
+}
+
+// SMART EXECUTE OFF-LINE IMMEDIATE, which the drive does by itself.
+void Command(const std::string &disk, unsigned char test, const std::string &attempted)
+{
+    unsigned char words[4] = {0xB0, test, 0xD4, 0};
+    const int fd = TAVOIDiskRawOpen(disk.c_str());
+    Must(fd >= 0, attempted);
+    const int result = ::ioctl(fd, HDIO_DRIVE_CMD, words);
+    const int error = errno;
+    ::close(fd);
+    if (result != 0)
+        throw SystemFailure(attempted, error);
+}
+
+void WaitForTest(const std::string &disk, const std::string &attempted)
+{
+    Progress progress(DeviceName(disk));
+    for (;; std::this_thread::sleep_for(std::chrono::seconds(2))) {
+        const SelfTest test = ReadSelfTest(disk, attempted);
+        if (!test.running) {
+            if (test.result != "passed")
+                throw Failure{.attempted = attempted, .reason = "the test " + test.result};
+            return;
+        }
+        progress.Show("self-test " + std::to_string(test.percent) + " %");
+    }
+}
+
+}  // namespace
+
+DiskHealth ReadHealth(const std::string &disk, bool wake)
+{
+    const std::string attempted = "read the health of " + disk;
+    DiskHealth health = {.disk = DeviceName(disk)};
+    if (!MayRead(disk, wake)) {
+        health.reason = "it is in standby, or does not tell whether it sleeps";
+        return health;
+    }
+    try {
+        const std::vector<SmartAttribute> attributes = ReadSmart(disk, attempted);
+        const SelfTest test = ReadSelfTest(disk, attempted);
+        const Verdict verdict = Judge(attributes, test);
+        health.verdict = verdict.verdict;
+        health.reason = Maybe(verdict.reason);
+        health.self_test = test.result;
+        if (test.running)
+            health.percent = test.percent;
+        constexpr int power_on_hours = 9;
+        constexpr uint64_t hours = 0xFFFFFF;  // above them some drives count milliseconds
+        if (const auto raw = RawOf(attributes, power_on_hours))
+            health.hours = *raw & hours;
+    } catch (const Failure &failure) {
+        health.reason = failure.reason;
+    }
+    return health;
+}
+
+Action DiskHealthList(Arguments &in)
+{
+    const auto words = in.Texts("DISK", disk_kind, disk_help, 0);
+    const auto wake = in.Flag("--wake", wake_help);
+    return [=](Call &call) {
+        std::vector<std::string> paths;
+        for (const std::string &word : *words)
+            paths.push_back(DiskPath(word));
+        std::vector<DiskHealth> disks;
+        for (const std::string &path : paths.empty() ? DiskPaths() : paths)
+            disks.push_back(ReadHealth(path, *wake));
+        call.List(health_columns, disks);
+        const bool fails =
+            std::any_of(disks.begin(), disks.end(), [](const DiskHealth &disk) { return disk.verdict == "failing"; });
+        if (fails)
+            call.status = exit_failed;
+    };
+}
+
+Action DiskTest(Arguments &in)
+{
+    const auto word = in.Text("DISK", disk_kind, disk_help);
+    const auto quick = in.Flag("--short", "a few minutes");
+    const auto thorough = in.Flag("--long", "all of the disk, for hours");
+    const auto stop = in.Flag("--stop", "end the test that runs");
+    const auto wait = in.Flag("--wait", "until the test has ended; fails when it has not passed");
+    return [=](Call &call) {
+        const std::string disk = DiskPath(*word);
+        const std::string attempted = "test " + disk;
+        if (*quick + *thorough + *stop != 1 || (*stop && *wait))
+            throw UsageFailure(attempted, "say one of --short, --long and --stop");
+        const SelfTest before = ReadSelfTest(disk, attempted);
+        if (before.running && !*stop)
+            throw BusyFailure(attempted, "a test runs, " + std::to_string(before.percent) + " % of it are done",
+                              "tavoctl disk test --stop ends it");
+        if (before.running || !*stop)
+            call.Change(disk, "self_test", before.result, *stop ? "stopped" : *quick ? "short" : "long");
+        if (!*stop) {
+            const int minutes = *quick ? before.short_minutes : before.long_minutes;
+            call.Tell("minutes", minutes > 0 ? std::optional(minutes) : std::nullopt);
+        }
+        if (call.Proceed())
+            Command(disk, *stop ? stop_test : *quick ? short_test : long_test, attempted);
+        if (*wait && !call.dry_run)
+            WaitForTest(disk, attempted);
+    };
+}
+
+}  // namespace tavoctl

@@ -1,0 +1,36 @@
+// The verbs of tavoctl disk about the health of drives.
+#ifndef TAVOCTL_DISK_VERBS_H
+#define TAVOCTL_DISK_VERBS_H
+
+#include "frame/verb.h"
+
+#include <cstdint>
+#include <optional>
+#include <string>
+
+namespace tavoctl {
+
+struct DiskHealth {
+    std::string disk;
+    std::optional<std::string> verdict = {}, reason = {}, self_test = {};
+    std::optional<int> percent = {};
+    std::optional<uint64_t> hours = {};
+};
+
+inline constexpr Column<DiskHealth> health_columns[] = {
+    {"disk", field<&DiskHealth::disk>},
+    {"verdict", field<&DiskHealth::verdict>, "good; worn: replace it soon; failing: replace it now"},
+    {"reason", field<&DiskHealth::reason>, "of the verdict, or why there is none"},
+    {"self_test", field<&DiskHealth::self_test>, "what came of the last one, or running"},
+    {"percent", field<&DiskHealth::percent>, "of a running self-test"},
+    {"hours", field<&DiskHealth::hours>, "that it was on"},
+};
+
+DiskHealth ReadHealth(const std::string &disk, bool wake);
+
+Action DiskHealthList(Arguments &in);
+Action DiskTest(Arguments &in);
+
+}  // namespace tavoctl
+
+#endif
