@@ -26,7 +26,8 @@ typedef struct TAVOEBOX {
     char rgszDisk[TAVO_EBOX_DISKS][16]; /* "/dev/sdaa" */
 } TAVOEBOX;
 
-/* The number of internal bays: "maxdisks", 1 to 10; 4 when the model does not say. */
+/* The number of internal bays: "maxdisks", 1 to 10; 4 when the model does not say.
+ * Files: /etc.defaults/tavoinfo.conf */
 TAVO_API int TAVOMaxDiskGet(void);
 
 /* Returns 1 when the internal port iPort (from 0) leads to an expansion unit and is no bay, else 0. Always 0 on a model
@@ -35,14 +36,16 @@ TAVO_API int TAVOEBoxDevIs(int iPort);
 
 /* Gives all expansion units, in the order of their ports, as a heap array for free. Returns their number; 0 with *ppBox
  * NULL when there is none or the model has no support for them; -1 with ERR_BAD_PARAMETERS (ppBox is NULL),
- * ERR_OPEN_FAILED (/sys cannot be searched) or ERR_OUT_OF_MEMORY. */
+ * ERR_OPEN_FAILED (/sys cannot be searched) or ERR_OUT_OF_MEMORY.
+ * Files: /sys/class/ata_device, /sys/class/ata_link, /sys/block */
 TAVO_API int TAVOEBoxInfoEnum(TAVOEBOX **ppBox);
 
 /* Returns 1 when the unit has power, else 0; 0 with ERR_BAD_PARAMETERS for NULL. */
 TAVO_API int TAVOEBoxIsPoweron(const TAVOEBOX *pBox);
 
 /* The largest size of an array member that the model uses, "raidsizelimit", in KiB; 0 without a limit. A limit
- * beyond an unsigned long (4 TiB on the appliance) is the largest one. */
+ * beyond an unsigned long (4 TiB on the appliance) is the largest one.
+ * Files: /etc.defaults/tavoinfo.conf */
 TAVO_API unsigned long RAIDSizeLimitGet(void);
 
 /* --- accounts --- */
@@ -53,26 +56,32 @@ TAVO_API unsigned long RAIDSizeLimitGet(void);
  * "+name". Everything else in the file stays as it is, byte for byte. Hold the Samba lock.
  * Returns 0 also when there is no such file, or -1 with
  *   ERR_BAD_PARAMETERS  pshNames is NULL
- *   ERR_OPEN_FAILED, ERR_READ_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED  the file, which is as it was */
+ *   ERR_OPEN_FAILED, ERR_READ_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED  the file, which is as it was
+ * Files: /usr/tavo/etc/smb.conf */
 TAVO_API int TAVOUserModifySmbConf(const TLIBSZHASH *pshNames);
 
 /* Appends the domain accounts that are recorded as in use, the lines of /usr/tavo/etc/duser_used that hold a backslash.
- * Returns how many; -1 with ERR_BAD_PARAMETERS (ppList or *ppList is NULL), ERR_READ_FAILED, or the list's code. */
+ * Returns how many; -1 with ERR_BAD_PARAMETERS (ppList or *ppList is NULL), ERR_READ_FAILED, or the list's code.
+ * Files: /usr/tavo/etc/duser_used */
 TAVO_API int TAVOPushDUserUsed(TLIBSZLIST **ppList);
 
 /* Sends the signal to the appliance's event daemon, by /var/run/scemd.pid; 47 tells it that accounts have changed.
- * Returns 0 also when no such daemon runs, or -1 with ERR_SYS_UNKNOWN. */
+ * Returns 0 also when no such daemon runs, or -1 with ERR_SYS_UNKNOWN.
+ * Files: /var/run/scemd.pid */
 TAVO_API int TLIBScemdNotify(int signal);
 
 /* Sends the signal to the download scheduler, by /var/run/scheduler.pid; 10 has it read the accounts again. As
- * TLIBScemdNotify. */
+ * TLIBScemdNotify.
+ * Files: /var/run/scheduler.pid */
 TAVO_API int TAVOSchedulerHup(int signal);
 
 /* --- services --- */
 
 /* Stops (1), starts (2), restarts (3) or reloads (4) the network-backup server, /usr/bin/rsync with
  * /usr/tavo/etc/rsyncd.conf, known by /var/run/rsyncd.pid. One that does not run is stopped; one that runs is started.
- * Returns 0, or -1 with ERR_BAD_PARAMETERS (another operation) or ERR_OP_FAILURE. */
+ * Returns 0, or -1 with ERR_BAD_PARAMETERS (another operation) or ERR_OP_FAILURE.
+ * Files: /var/run/rsyncd.pid
+ * Runs: /usr/bin/rsync */
 TAVO_API int TAVONetBkpService(int operation);
 
 TAVO_END_DECLS

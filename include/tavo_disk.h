@@ -136,7 +136,8 @@ TAVO_API int DiskPathParse(const char *szPath, DISKPATH *pParsed);
  *   ERR_BAD_PARAMETERS   an argument is NULL
  *   ERR_OUT_OF_MEMORY
  * or without a code of its own: szPath is no disk, or the disk cannot be opened or asked for its size. *ppInfo is only
- * written with 1. A model that cannot be read is empty. */
+ * written with 1. A model that cannot be read is empty.
+ * Files: /sys/block */
 TAVO_API int DiskInfoGet(const char *szPath, DISKINFO **ppInfo);
 TAVO_API void DiskInfoFree(DISKINFO *pInfo);
 
@@ -144,7 +145,8 @@ TAVO_API void DiskInfoFree(DISKINFO *pInfo);
  * expansion units that have power, in this order. pFilter points to DISK_ENUM_ flags; NULL or 0 for all. Empty bays and
  * disks that cannot be read are passed over, the latter logged.
  * Returns the number of disks and puts the list, NULL for none, into *ppList, for DiskInfoEnumFree. -1, with *ppList
- * NULL: ERR_BAD_PARAMETERS (ppList is NULL), ERR_OUT_OF_MEMORY, or the units cannot be enumerated. */
+ * NULL: ERR_BAD_PARAMETERS (ppList is NULL), ERR_OUT_OF_MEMORY, or the units cannot be enumerated.
+ * Files: /etc.defaults/tavoinfo.conf, /sys/block */
 TAVO_API int DiskInfoEnum(const int *pFilter, DISKLIST **ppList);
 TAVO_API void DiskInfoEnumFree(DISKLIST *pList);
 
@@ -156,7 +158,8 @@ TAVO_API int DiskListPush(DISKLIST **ppList, DISKINFO *pInfo);
  * nKind must be 1. Returns the count; 0 with *ppNumber NULL when there is none; -1 with
  *   ERR_BAD_PARAMETERS   nKind is not 1 or ppNumber is NULL
  *   ERR_OUT_OF_MEMORY
- *   ERR_OPEN_FAILED, ERR_READ_FAILED   /proc/partitions */
+ *   ERR_OPEN_FAILED, ERR_READ_FAILED   /proc/partitions
+ * Files: /proc/partitions */
 TAVO_API int TAVODiskEnum(int nKind, int32_t **ppNumber);
 
 /* Gives the summary of the disk with that device number as a heap block for free. nKind must be 1. Returns 0, or -1 with
@@ -164,7 +167,8 @@ TAVO_API int TAVODiskEnum(int nKind, int32_t **ppNumber);
  *   ERR_NO_DISK_ID          /proc/partitions has no whole disk of this number
  *   ERR_DISK_IO_FAILED      the disk cannot be opened or asked for its size
  *   ERR_NOT_ENOUGH_MEMORY   no memory for the record
- *   ERR_OUT_OF_MEMORY, ERR_OPEN_FAILED, ERR_READ_FAILED   /proc/partitions */
+ *   ERR_OUT_OF_MEMORY, ERR_OPEN_FAILED, ERR_READ_FAILED   /proc/partitions
+ * Files: /proc/partitions */
 TAVO_API int TAVODiskGetInfo(int nKind, int nDevice, TAVODISKINFO **ppInfo);
 
 /* Tells where a disk sits: DISK_CONTAINER_ into *pKind. The path may lack its "/dev/". Returns 0, or -1, logged. Sets no
@@ -196,16 +200,19 @@ TAVO_API int TAVODiskPartitionNumGet(const char *szPath, char *szBase, int cbBas
  *   ERR_STAT_FAILED     fd is no open descriptor
  *   ERR_NOT_A_DISK      it is no block device
  *   ERR_NO_DISK_ID      the kernel has no such device (any more)
- *   ERR_OUT_OF_MEMORY */
+ *   ERR_OUT_OF_MEMORY
+ * Files: /sys/dev/block */
 TAVO_API char *TAVODiskGetDevnameFromFd(int fd);
 
 /* Gives the drive model of the whole disk szPath, as it stands in /sys/block/NAME/device/model; a longer text is cut.
  * Returns 0, or -1, logged: the disk cannot be opened, there is no model; with ERR_BAD_PARAMETERS for a NULL argument, a
- * size below 1 or a path that is not "/dev/" and a plain name. */
+ * size below 1 or a path that is not "/dev/" and a plain name.
+ * Files: /sys/block */
 TAVO_API int TAVOLnxDiskGetModel(const char *szPath, char *szModel, int cbModel);
 
 /* Tells whether the disk hangs on a controller that takes raw commands through marvell_command_interface: 1 or 0; -1,
- * logged, when its link in /sys/block or the controller's id cannot be read. */
+ * logged, when its link in /sys/block or the controller's id cannot be read.
+ * Files: /sys/block */
 TAVO_API int TAVODiskIsMvSocDriver(const char *szPath);
 
 /* Tells from the identification of the drive whether it has no rotating medium: 1 or 0; -1, logged, when it cannot be
@@ -218,7 +225,8 @@ TAVO_API int TAVOIsUSBDiskFATNoPartition(const char *szPath);
 
 /* Reads how far the wiping job of a disk has come, in MiB, from /tmp/tavodd.NAME, which the job writes. Returns 0 when
  * both numbers were read, and also 0, with both outputs untouched, when there is no such file: no job. -1 when the line
- * is malformed, an argument is NULL, or the path does not end in a plain name. */
+ * is malformed, an argument is NULL, or the path does not end in a plain name.
+ * Files: /tmp/tavodd.* */
 TAVO_API int DiskDDStatusGet(const char *szPath, uint64_t *pcMibDone, uint64_t *pcMibTotal);
 
 /* Clears a layout and numbers the entries 0 to 511. NULL is ignored. */
@@ -226,7 +234,8 @@ TAVO_API void DiskPartitionsLayoutInit(TavoPartitionLayout *pLayout);
 
 /* Fills the caller's block with the partitions of the disk of kernel name szName ("sda") from /proc/partitions, and tells
  * what kind of layout they make. Returns 0, also when there is no such disk (nEntry is 0 then); -1, logged: the file
- * cannot be read, or with ERR_BAD_PARAMETERS an argument is NULL or the name shorter than 2 characters. */
+ * cannot be read, or with ERR_BAD_PARAMETERS an argument is NULL or the name shorter than 2 characters.
+ * Files: /proc/partitions */
 TAVO_API int DiskPartitionsLayoutGet(const char *szName, TavoPartitionLayout *pLayout);
 
 /* --- raw commands --- */
@@ -290,7 +299,8 @@ TAVO_API int TAVODiskSetStandbySeconds(int nSecond);
 TAVO_API int TAVODiskGetStandbyTimer(int *pnMinute);
 
 /* The saved minutes themselves, the key "standbytimer" of /etc/tavoinfo.conf. Get returns -1 when there is no number.
- * Set returns 0, or -1 with the code of TAVOINFOSetKeyValue; it takes the settings file's lock. */
+ * Set returns 0, or -1 with the code of TAVOINFOSetKeyValue; it takes the settings file's lock.
+ * Files: /etc/tavoinfo.conf */
 TAVO_API int TAVODiskGetFileSBTimerSetting(void);
 TAVO_API int TAVODiskSetFileSBTimerSetting(int nMinute);
 

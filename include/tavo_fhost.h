@@ -40,14 +40,17 @@ TAVO_API uint32_t ErrFHOSTSendQueryPkt(void);
  * The daemon counts as running when a process of root holds the lock of its pid file.
  * Returns 0, or -1 with ERR_OP_FAILURE (the daemon does not start, or an interface could not send), ERR_CREATE_FAILED or
  * ERR_RENAME_FAILED (the list cannot be made or moved). What somebody else left in the list's place is removed first; a
- * folder is moved out of the way. */
+ * folder is moved out of the way.
+ * Files: /tmp/tavods.list, /var/run/findhostd.pid
+ * Runs: /usr/tavo/bin/findhostd */
 TAVO_API int TAVOFHOSTDumpHost(void);
 
 /* Reads the collected list into the caller's hash *ppshHosts, which may move: a key "NAME(ADDRESS)" with the value
  * ADDRESS for each host. What the hosts say of themselves is not to be trusted: a line whose address is none is skipped,
  * a name is at most 255 bytes long. The list is deleted once it could be opened.
  * Returns the number of pairs in the hash, 0 with ERR_OPEN_FAILED when there is no list (or what stands there is not
- * ours), or -1 with ERR_BAD_PARAMETERS (NULL), ERR_READ_FAILED or ERR_OUT_OF_MEMORY. */
+ * ours), or -1 with ERR_BAD_PARAMETERS (NULL), ERR_READ_FAILED or ERR_OUT_OF_MEMORY.
+ * Files: /tmp/tavods.list */
 TAVO_API int TAVOFHOSTGet2Hash(TLIBSZHASH **ppshHosts);
 
 /* An appliance as it describes itself; nothing of it but the address is to be trusted. */
@@ -68,7 +71,8 @@ typedef int (*TAVOFHOSTCALLBACK)(const TAVOFHOST *pHost, void *pContext);
  * among those that come first.
  * Returns the number of hosts that were handed over, or -1 with ERR_BAD_PARAMETERS (pfnHost is NULL, cSeconds below 1),
  * ERR_OP_FAILURE (the daemon does not start, or an interface could not send and nobody answered on the others) or
- * ERR_OUT_OF_MEMORY. */
+ * ERR_OUT_OF_MEMORY.
+ * Files: /tmp/tavods.list */
 TAVO_API int TAVOFHOSTEnum(TAVOFHOSTCALLBACK pfnHost, void *pContext, int cSeconds);
 
 TAVO_END_DECLS

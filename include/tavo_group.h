@@ -99,7 +99,9 @@ TAVO_API int BlTLIBIsGroupName(const char *szName);
  *   ERR_BAD_PARAMETERS     ppGroup is NULL, or the name NULL or empty
  *   ERR_NO_SUCH_GROUP      there is no such group
  *   ERR_INVALID_GROUPNAME  the name cannot be converted, or the stored line has an empty one
- *   ERR_FORMAT_ERROR       the stored line has the wrong number of fields */
+ *   ERR_FORMAT_ERROR       the stored line has the wrong number of fields
+ * Files: /etc/group, /etc/group_desc, /tmp/.db.group.* (rebuilt where they are not current)
+ * Locks: TAVO_LOCK_GROUP (shared, at most 5 s) */
 TAVO_API int TAVOGroupGet(const char *szName, TAVOGROUP **ppGroup);
 TAVO_API int TAVOGroupGetByGID(int gid, TAVOGROUP **ppGroup);
 
@@ -109,12 +111,16 @@ TAVO_API int TAVOGroupGetByGID(int gid, TAVOGROUP **ppGroup);
  * ByPrefix and BySubstr list only names that begin with, or hold, szText, without regard to case; "" selects all.
  * Fails with
  *   ERR_BAD_PARAMETERS  ppList, *ppList or szText is NULL, or no flag is set
- *   ERR_ENUM_FAILED     the database cannot be walked */
+ *   ERR_ENUM_FAILED     the database cannot be walked
+ * Files: /etc/group, /etc/group_desc, /tmp/.db.group.* (rebuilt where they are not current)
+ * Locks: TAVO_LOCK_GROUP (shared, at most 5 s) */
 TAVO_API int TAVOGroupEnum(TLIBSZLIST **ppList, int flags);
 TAVO_API int TAVOGroupEnumByPrefix(TLIBSZLIST **ppList, int flags, const char *szText);
 TAVO_API int TAVOGroupEnumBySubstr(TLIBSZLIST **ppList, int flags, const char *szText);
 
-/* The number of names that TAVOGroupEnum would append. Fails as it does. */
+/* The number of names that TAVOGroupEnum would append. Fails as it does.
+ * Files: /etc/group, /etc/group_desc, /tmp/.db.group.* (rebuilt where they are not current)
+ * Locks: TAVO_LOCK_GROUP (shared, at most 5 s) */
 TAVO_API int TAVOGroupTotalNum(int flags);
 
 /* Appends the members of a group that are existing users, in their stored order, and returns how many; for "users" (any
@@ -127,7 +133,9 @@ TAVO_API int TAVOGroupListMember(const char *szName, TLIBSZLIST **ppList);
  *   ERR_BAD_PARAMETERS     the name is NULL or empty, or the buffer none
  *   ERR_NO_SUCH_GROUP      there is no such group
  *   ERR_INVALID_GROUPNAME  the name cannot be converted
- *   ERR_NOT_ENOUGH_MEMORY  the buffer is too small */
+ *   ERR_NOT_ENOUGH_MEMORY  the buffer is too small
+ * Files: /etc/group, /etc/group_desc, /tmp/.db.group.* (rebuilt where they are not current)
+ * Locks: TAVO_LOCK_GROUP (shared, at most 5 s) */
 TAVO_API int TAVOGroupDescGet(const char *szName, char *szBuf, int cbBuf);
 
 /*
@@ -148,14 +156,19 @@ TAVO_API int TAVOGroupDescGet(const char *szName, char *szBuf, int cbBuf);
  *   ERR_GROUP_EXISTS       there is a group of the new name
  *   ERR_INVALID_GROUPNAME  the new name is not acceptable, is "." or "..", or belongs to a domain
  *   ERR_BAD_PARAMETERS     an id below -1; a member with a comma, a colon or a control character, or of more than 512
- *                          bytes */
+ *                          bytes
+ * Files: /etc/group, /etc/group_desc, /tmp/.db.group.*, /usr/tavo/etc/smb.conf, /usr/tavo/etc/share.conf,
+ *   /usr/tavo/etc/afpd.conf, /etc/ftpchroot, /etc/.tavoaccount.commit
+ * Locks: TAVO_LOCK_USER (exclusive, at most 5 s), TAVO_LOCK_GROUP (exclusive), TAVO_LOCK_SMB (exclusive) */
 TAVO_API int TAVOGroupSet(const char *szOldName, const TAVOGROUP *pGroup);
 
 /* Deletes groups, "system" ones too: there is no protected name. Domain groups are skipped; a group that does not exist
  * or cannot be deleted is logged, its code stays in the error state, and the others are deleted all the same. The
  * groups also leave the privilege lists of the shared folders and Samba's settings; a failure there is logged only.
  * Returns 0 also when none was deleted. Fails with ERR_BAD_PARAMETERS (rgszName NULL with nGroup not 0, or nGroup
- * negative). */
+ * negative).
+ * Files: /etc/group, /etc/group_desc, /tmp/.db.group.*, /usr/tavo/etc/smb.conf, /usr/tavo/etc/share.conf
+ * Locks: TAVO_LOCK_GROUP (exclusive, at most 5 s), TAVO_LOCK_SMB (exclusive) */
 TAVO_API int TAVOGroupDelete(const char *const *rgszName, int nGroup);
 
 /* Sets the description of a group; NULL or "" deletes it.
@@ -163,12 +176,16 @@ TAVO_API int TAVOGroupDelete(const char *const *rgszName, int nGroup);
  *   ERR_BAD_PARAMETERS     the name is NULL or empty, or the description holds a colon or a control character or has
  *                          more than 512 bytes
  *   ERR_NO_SUCH_GROUP      there is no such group
- *   ERR_INVALID_GROUPNAME  the name cannot be converted */
+ *   ERR_INVALID_GROUPNAME  the name cannot be converted
+ * Files: /etc/group, /etc/group_desc, /tmp/.db.group.*
+ * Locks: TAVO_LOCK_GROUP (exclusive, at most 5 s) */
 TAVO_API int TAVOGroupDescSet(const char *szName, const char *szDesc);
 
 /* Applies renames and deletions of users to the member lists of all groups: pshNames maps upper-case old names to new
  * names, "" for a deleted user. The files are rewritten once, and only when a list has changed.
- * Fails with ERR_BAD_PARAMETERS (pshNames NULL). */
+ * Fails with ERR_BAD_PARAMETERS (pshNames NULL).
+ * Files: /etc/group, /etc/group_desc, /tmp/.db.group.*
+ * Locks: TAVO_LOCK_GROUP (exclusive, at most 5 s) */
 TAVO_API int TAVOUserModifyGroup(const TLIBSZHASH *pshNames);
 
 /*

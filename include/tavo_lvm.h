@@ -58,18 +58,22 @@ TAVO_API int LVMIsSupport(void);
 
 /* --- physical volumes --- */
 
-/* Makes a physical volume; what is on the device is lost. Returns 0 or -1. */
+/* Makes a physical volume; what is on the device is lost. Returns 0 or -1.
+ * Runs: /sbin/pvcreate */
 TAVO_API int LVMPvCreate(const char *szDevice);
 
 /* Has every physical volume of the group use the whole of its device. Returns 0; -1 when one failed, the others are grown
- * all the same. */
+ * all the same.
+ * Runs: /sbin/pvresize */
 TAVO_API int LVMPvExpand(const LVMVGINFO *pInfo);
 
 /* Reads one physical volume into the caller's record: 1; 0 when the device is none; -1. The record is only written with
- * 1. */
+ * 1.
+ * Runs: /sbin/pvs */
 TAVO_API int LVMPvSBGet(const char *szDevice, LVMPV *pPv);
 
-/* Reads all physical volumes. Returns their number and a list for LVMPvSBListFree, NULL for none; -1 with *ppList NULL. */
+/* Reads all physical volumes. Returns their number and a list for LVMPvSBListFree, NULL for none; -1 with *ppList NULL.
+ * Runs: /sbin/pvs */
 TAVO_API int LVMPvSBEnum(LVMPVLIST **ppList);
 
 /* Reads a line "  PV|VG|UUID|COUNT" of pvs. Returns 0; -1, silently and with the record untouched, when it is none. */
@@ -79,24 +83,30 @@ TAVO_API int LVMPvParseLine(const char *szLine, LVMPV *pPv);
 TAVO_API int LVMPvSBListPush(LVMPVLIST **ppList, const LVMPV *pPv);
 TAVO_API void LVMPvSBListFree(LVMPVLIST *pList);
 
-/* Has the system look for physical volumes anew. Returns 0 or -1. */
+/* Has the system look for physical volumes anew. Returns 0 or -1.
+ * Runs: /sbin/pvscan */
 TAVO_API int LVMPvScan(void);
 
-/* Makes a device no physical volume any more, whatever it belongs to. Returns 0 or -1. */
+/* Makes a device no physical volume any more, whatever it belongs to. Returns 0 or -1.
+ * Runs: /sbin/pvremove */
 TAVO_API int LVMPvRemove(const char *szDevice);
 
 /* --- volume groups --- */
 
-/* Makes a group of physical volumes. A first failure is tried again. Returns 0 or -1. */
+/* Makes a group of physical volumes. A first failure is tried again. Returns 0 or -1.
+ * Runs: /sbin/vgcreate */
 TAVO_API int LVMVgCreate(const char *szVg, const TLIBSZLIST *pslDevices);
 
-/* Removes a group, and its directory in /dev. Returns 0 or -1. */
+/* Removes a group, and its directory in /dev. Returns 0 or -1.
+ * Runs: /sbin/vgremove, /bin/rm */
 TAVO_API int LVMVgRemove(const char *szVg);
 
-/* Renames a group, given by its path, or when that is NULL by its name. Returns 0 or -1. */
+/* Renames a group, given by its path, or when that is NULL by its name. Returns 0 or -1.
+ * Runs: /sbin/lvm */
 TAVO_API int LVMVgRename(const char *szVg, const char *szOldName, const char *szNewName);
 
-/* Reads a group: 1; 0 when there is none; -1. The record is only written with 1. */
+/* Reads a group: 1; 0 when there is none; -1. The record is only written with 1.
+ * Runs: /sbin/vgs */
 TAVO_API int LVMVgSBGet(const char *szVg, LVMVG *pVg);
 
 /* An empty record for LVMVgInfoFree; NULL with ERR_OUT_OF_MEMORY. */
@@ -113,11 +123,13 @@ TAVO_API int LVMVgSBListSearch(const LVMVGLIST *pList, const LVMVGKEY *pKey, LVM
 
 /* --- logical volumes --- */
 
-/* Makes the volume that fills the group; what an earlier volume left at that place is wiped. Returns 0 or -1. */
+/* Makes the volume that fills the group; what an earlier volume left at that place is wiped. Returns 0 or -1.
+ * Runs: /sbin/lvcreate */
 TAVO_API int LVMLvCreate(const char *szVg, const char *szLv);
 
 /* Makes physical volumes of all devices, in order, a group of them, and its volume. The group's UUID goes into szUuid unless
- * that is NULL, cut to cbUuid bytes with the final NUL. Returns 0, or -1 at the first failure. */
+ * that is NULL, cut to cbUuid bytes with the final NUL. Returns 0, or -1 at the first failure.
+ * Runs: /sbin/pvcreate, /sbin/vgcreate, /sbin/lvcreate */
 TAVO_API int LVMCreate(const TLIBSZLIST *pslDevices, const char *szVg, const char *szLv, char *szUuid, int cbUuid);
 
 /* Gives the path of the first logical volume on a device, "/dev/vg1/lv": 1; 0 when there is none; -1 when szPath is too
@@ -125,15 +137,20 @@ TAVO_API int LVMCreate(const TLIBSZLIST *pslDevices, const char *szVg, const cha
 TAVO_API int LVMGetLVPath(const char *szDevice, char *szPath, int cbPath);
 
 /* Removes the logical volume of a device with its mounted snapshots ("lv", "s" and a number), the group and the physical
- * volume. What fails is logged, and the next step taken. Returns 0; -1 for a bad argument. */
+ * volume. What fails is logged, and the next step taken. Returns 0; -1 for a bad argument.
+ * Files: /proc/mounts
+ * Runs: /bin/umount, /sbin/lvremove, /sbin/vgremove, /sbin/pvremove */
 TAVO_API int LVMRemoveLV(const char *szDevice);
 
-/* Removes the logical volumes of a group. szKind is "lv". Returns 0 or -1. */
+/* Removes the logical volumes of a group. szKind is "lv". Returns 0 or -1.
+ * Runs: /sbin/lvremove */
 TAVO_API int LVMRemove(const char *szVg, const char *szKind);
 
 /* Removes every physical volume on a disk or a partition ("/dev/sd"): the appliance has them on arrays alone. USB disks,
  * and groups that reach onto one, stay. Does nothing on a model without LVM. Returns 0; -1 when the physical volumes cannot
- * be listed, or, with nothing changed, when one of them is mounted or otherwise in use, which is logged. */
+ * be listed, or, with nothing changed, when one of them is mounted or otherwise in use, which is logged.
+ * Files: /sys/class/block, /dev/mapper
+ * Runs: /sbin/pvs */
 TAVO_API int LVMCleanIllegal(void);
 
 TAVO_END_DECLS

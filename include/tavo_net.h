@@ -102,11 +102,13 @@ TAVO_API int ErrTLIBSubnetToIpMask(char *szIn, char *szOut);
  */
 
 /* Reads the first wired interface, from its file and the kernel (/sys/class/net). Returns 0 (with empty addresses when
- * it has none), or -1 with *pCard untouched and ERR_BAD_PARAMETERS (NULL) or ERR_FILE_NOT_FOUND (no interface). */
+ * it has none), or -1 with *pCard untouched and ERR_BAD_PARAMETERS (NULL) or ERR_FILE_NOT_FOUND (no interface).
+ * Files: /etc/sysconfig/network-scripts, /etc/sysconfig/network, /sys/class/net */
 TAVO_API int TAVONetGetCard1(TAVONETCARD *pCard);
 
 /* The same of any interface, also of one that is the member of a bond: ERR_FILE_NOT_FOUND when the kernel has none of that
- * name, ERR_BAD_PARAMETERS when it is no name. */
+ * name, ERR_BAD_PARAMETERS when it is no name.
+ * Files: /etc/sysconfig/network-scripts, /etc/sysconfig/network, /sys/class/net */
 TAVO_API int TAVONetGetCard(const char *szInterface, TAVONETCARD *pCard);
 
 /* Gives the interface pCard->szInterface its address. With DHCP a client that runs is killed, then a new one has 30 s to
@@ -119,32 +121,45 @@ TAVO_API int TAVONetGetCard(const char *szInterface, TAVONETCARD *pCard);
  *   ERR_BAD_PARAMETERS   pCard is NULL, or its interface is no name
  *   ERR_INVALID_NETNAME  the address or the mask is not valid
  *   ERR_LOCK_FAILED
- *   ERR_OP_FAILURE       a command failed, or the old client cannot be killed (30 attempts, one a second) */
+ *   ERR_OP_FAILURE       a command failed, or the old client cannot be killed (30 attempts, one a second)
+ * Files: /etc/sysconfig/network-scripts, /etc/sysconfig/network, /etc/hosts, /etc/resolv.conf,
+ *   /etc/ppp/old_gateway.bak, /var/run/ddnsd.pid, /etc/network.undo
+ * Runs: /sbin/ifconfig, /sbin/route, /sbin/dhcpcd
+ * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetSetCard1(const TAVONETCARD *pCard, const TAVONETCARD *pPrevious);
 
 /* 1 when the file of the interface says BOOTPROTO=dhcp, else 0; a file without the key gets BOOTPROTO=static. Holds the
- * network lock shared (0x105, at most 5 s); when it cannot be had the answer is 0. */
+ * network lock shared (0x105, at most 5 s); when it cannot be had the answer is 0.
+ * Files: /etc/sysconfig/network-scripts
+ * Locks: TAVO_LOCK_HOST (shared, at most 5 s) */
 TAVO_API int BlTAVOLnxIsDHCP(const char *szInterface);
 
 /* The default gateway: of the kernel (/proc/net/route), and as stored (GATEWAY). It goes to szGateway.
  * Return 0, or -1 with ERR_BAD_PARAMETERS, ERR_KEY_NOT_FOUND (there is none), ERR_NOT_ENOUGH_MEMORY (the buffer is too
- * small; 16 bytes always do), ERR_OPEN_FAILED, ERR_FORMAT_ERROR (the kernel's table has an unknown form). */
+ * small; 16 bytes always do), ERR_OPEN_FAILED, ERR_FORMAT_ERROR (the kernel's table has an unknown form).
+ * Files: /proc/net/route, /etc/sysconfig/network */
 TAVO_API int TAVONetDefaultGatewayGet(char *szGateway, int cbGateway);
 TAVO_API int TAVONetDefaultGatewayGetConf(char *szGateway, int cbGateway);
 
 /* Makes szGateway the default gateway and stores it. Returns 0, or -1 with the old gateway in force and stored and
  * ERR_BAD_PARAMETERS (NULL), ERR_INVALID_NETNAME, ERR_LOCK_FAILED, ERR_OP_FAILURE (it cannot be reached from any
- * interface) or a code of the settings files. */
+ * interface) or a code of the settings files.
+ * Files: /etc/sysconfig/network, /etc/network.undo
+ * Runs: /sbin/route
+ * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetDefaultGatewaySet(const char *szGateway);
 
 /* The stored host name goes to szName (16 bytes always do). Returns 0, or -1 with ERR_BAD_PARAMETERS, ERR_KEY_NOT_FOUND
- * (none is stored), ERR_NOT_ENOUGH_MEMORY or ERR_OPEN_FAILED. */
+ * (none is stored), ERR_NOT_ENOUGH_MEMORY or ERR_OPEN_FAILED.
+ * Files: /etc/sysconfig/network */
 TAVO_API int TAVOLnxGetHostname(char *szName, int cbName);
 
 /* Stores the host name, rewrites the two lines of /etc/hosts that name localhost and the appliance (the administrator's
  * lines stay; the name stands for the address of the first wired interface that has one, or for 127.0.1.1), and gives the
  * name to the kernel. Returns 0, or -1 with the old name everywhere and ERR_BAD_PARAMETERS (NULL), ERR_INVALID_NETNAME,
- * ERR_LOCK_FAILED, ERR_SYS_UNKNOWN (the kernel refused) or a code of the settings files. */
+ * ERR_LOCK_FAILED, ERR_SYS_UNKNOWN (the kernel refused) or a code of the settings files.
+ * Files: /etc/sysconfig/network, /etc/hosts, /etc/network.undo
+ * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVOLnxSetHostname(const char *szName);
 
 /* Rewrites the line of /etc/hosts that names the appliance where it is not true any more: the host name (the kernel's
@@ -153,7 +168,9 @@ TAVO_API int TAVOLnxSetHostname(const char *szName);
  * finishes a change that was cut off. It never waits: while somebody holds the network lock it does nothing, and the holder
  * rewrites the file when it is done.
  * Returns 0 (the file is true), 1 (left to the holder of the lock), or -1 with ERR_CREATE_FAILED or ERR_OPEN_FAILED (of
- * the lock files) or a code of the settings files. */
+ * the lock files) or a code of the settings files.
+ * Files: /etc/hosts, /etc/network.undo
+ * Locks: TAVO_LOCK_HOST (exclusive, without waiting) */
 TAVO_API int TAVONetHostsRefresh(void);
 
 /*
@@ -166,44 +183,55 @@ TAVO_API int TAVONetHostsRefresh(void);
  */
 
 /* Takes a checkpoint for the calling process. ERR_FILE_EXISTS: another process that lives has one. ERR_READ_FAILED (one of
- * the files cannot be read), or a code of the settings files: there is none now. */
+ * the files cannot be read), or a code of the settings files: there is none now.
+ * Files: /etc/network.undo */
 TAVO_API int TAVONetCheckpointTake(void);
 
 /* Ends the checkpoint and keeps the network as it is. Any process may do that. ERR_FILE_NOT_FOUND: there is
- * none, or its process has died and the network has just been put back. ERR_REMOVE_FAILED: it is still there. */
+ * none, or its process has died and the network has just been put back. ERR_REMOVE_FAILED: it is still there.
+ * Files: /etc/network.undo */
 TAVO_API int TAVONetCheckpointEnd(void);
 
 /* Puts the network back as it was when the checkpoint was taken, and ends the checkpoint. Interfaces that are as they were
  * are left alone. When interfaces were added or removed (bonds, VLANs), /etc/rc.network stops the network and starts it with
  * the old files. A DHCP client that ran is started again without waiting for it. ERR_FILE_NOT_FOUND: there is none.
- * ERR_OP_FAILURE: an address could not be set; all the rest is as it was. */
+ * ERR_OP_FAILURE: an address could not be set; all the rest is as it was.
+ * Files: /etc/network.undo */
 TAVO_API int TAVONetCheckpointPutBack(void);
 
 /* Pushes the name servers of /etc/resolv.conf onto *ppServers, which may move. Returns how many, or -1 with
- * ERR_BAD_PARAMETERS, ERR_OPEN_FAILED or ERR_OUT_OF_MEMORY. */
+ * ERR_BAD_PARAMETERS, ERR_OPEN_FAILED or ERR_OUT_OF_MEMORY.
+ * Files: /etc/resolv.conf */
 TAVO_API int TAVONetDNSGet(TLIBSZLIST **ppServers);
 
 /* Replaces /etc/resolv.conf (behind a link, the file that it leads to) by one "nameserver" line for each address, IPv4
  * or IPv6. Returns 0, or -1 with the old file in place and ERR_BAD_PARAMETERS (NULL), ERR_INVALID_NETNAME (not an
- * address), ERR_LOCK_FAILED or a code of the settings files. */
+ * address), ERR_LOCK_FAILED or a code of the settings files.
+ * Files: /etc/resolv.conf
+ * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetDNSSet(const TLIBSZLIST *pServers);
 
 /* The MTU of an interface in bytes, stored as "NAME_mtu" in /etc/tavoinfo.conf; 1500 when none is. As text to szMtu (16
  * bytes always do): 0 or -1 with ERR_BAD_PARAMETERS or ERR_NOT_ENOUGH_MEMORY. As a number: the result, or -1 with
- * ERR_BAD_PARAMETERS or ERR_FORMAT_ERROR (what is stored is no MTU). */
+ * ERR_BAD_PARAMETERS or ERR_FORMAT_ERROR (what is stored is no MTU).
+ * Files: /etc/tavoinfo.conf */
 TAVO_API int TAVOConfGetMTUValue(const char *szInterface, char *szMtu, int cbMtu);
 TAVO_API int TAVOGetMTUSetting(const char *szInterface);
 
 /* Sets the MTU, 68 to 65535 bytes: stored (under the lock of the system settings), in the kernel (under the network
  * lock), or both: in the kernel first, so that nothing is stored that the card refuses, with both locks in one request.
  * Return 0, or -1 with nothing changed and ERR_BAD_PARAMETERS, ERR_LOCK_FAILED, ERR_OP_FAILURE (ifconfig failed) or a code
- * of the settings files. */
+ * of the settings files.
+ * Files: /etc/tavoinfo.conf, /etc/network.undo
+ * Runs: /sbin/ifconfig
+ * Locks: TAVO_LOCK_TAVOINFO (exclusive, at most 5 s), TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVOConfSetMTUValue(const char *szInterface, int mtu);
 TAVO_API int TAVONetSetMTUEth(const char *szInterface, int mtu);
 TAVO_API int TAVONetSetMTUValue(const char *szInterface, int mtu);
 
 /* 1 when another host answers for szAddr (one ping, at most 2 s), 0 when none does or the interface itself has the
- * address; -1 with ERR_BAD_PARAMETERS, or ERR_OP_FAILURE when /bin/ping cannot be run. */
+ * address; -1 with ERR_BAD_PARAMETERS, or ERR_OP_FAILURE when /bin/ping cannot be run.
+ * Runs: /bin/ping */
 TAVO_API int TAVOIIpConflict(const char *szInterface, const char *szAddr);
 
 /* The same before the address is taken, by ARP as RFC 5227 describes it, so that a host that answers no ping is noticed, and
@@ -212,21 +240,26 @@ TAVO_API int TAVOIIpConflict(const char *szInterface, const char *szAddr);
  * ERR_OP_FAILURE (the interface is down). */
 TAVO_API int TAVONetAddressProbe(const char *szInterface, const char *szAddr, int cMilliseconds);
 
-/* 1 when the cable of the interface has something at its other end, else 0. */
+/* 1 when the cable of the interface has something at its other end, else 0.
+ * Files: /sys/class/net */
 TAVO_API int BlTLIBIsConnected(const char *szInterface);
 
 /* 1 when a TCP or UDP socket has the local port (1 to 65535; /proc/net/tcp, /proc/net/udp, and tcp6 and udp6 beside them
- * where the kernel has IPv6), else 0; also 0 with ERR_BAD_PARAMETERS or ERR_OPEN_FAILED. */
+ * where the kernel has IPv6), else 0; also 0 with ERR_BAD_PARAMETERS or ERR_OPEN_FAILED.
+ * Files: /proc/net/tcp, /proc/net/udp, /proc/net/tcp6, /proc/net/udp6 */
 TAVO_API int BlTLIBIsPortInUse(int port);
 
 /* Adds or removes the route to a network behind an interface, which may be the dial-up one, ppp0. Return 0, or -1 with
  * ERR_BAD_PARAMETERS, ERR_INVALID_NETNAME (no address, no contiguous mask, or bits of the address outside of the mask),
- * ERR_LOCK_FAILED or ERR_OP_FAILURE (the tool failed: there is such a route already, or none to remove). */
+ * ERR_LOCK_FAILED or ERR_OP_FAILURE (the tool failed: there is such a route already, or none to remove).
+ * Runs: /sbin/route
+ * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetRouteAdd(const char *szNet, const char *szMask, const char *szInterface);
 TAVO_API int TAVONetRouteDel(const char *szNet, const char *szMask, const char *szInterface);
 
 /* Whether a DHCP server answers on an interface within cSeconds (at least 1); no lease is taken (/sbin/dhcpcd -T). Returns
- * 0 when one answers, 1 when none does, or -1 with ERR_BAD_PARAMETERS or ERR_OP_FAILURE (the client cannot be run). */
+ * 0 when one answers, 1 when none does, or -1 with ERR_BAD_PARAMETERS or ERR_OP_FAILURE (the client cannot be run).
+ * Runs: /sbin/dhcpcd */
 TAVO_API int TAVONetDhcpTest(const char *szInterface, int cSeconds);
 
 /*
@@ -239,23 +272,33 @@ TAVO_API int TAVONetDhcpTest(const char *szInterface, int cSeconds);
  *   ERR_OP_FAILURE       the kernel refused: no such interface, no IPv6, there already, or not there to remove
  */
 
-/* Switches IPv6 on an interface on (fEnable not 0) or off. */
+/* Switches IPv6 on an interface on (fEnable not 0) or off.
+ * Files: /proc/sys/net/ipv6/conf (written), /etc/sysconfig/network-scripts, /etc/network.undo
+ * Runs: /bin/echo
+ * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetIPv6Set(const char *szInterface, int fEnable);
 
 /* 1 when the interface speaks IPv6, else 0; also 0 with ERR_BAD_PARAMETERS or ERR_OPEN_FAILED (there is no such
- * interface, or the kernel has no IPv6). */
+ * interface, or the kernel has no IPv6).
+ * Files: /proc/sys/net/ipv6/conf */
 TAVO_API int BlTAVONetIPv6IsEnabled(const char *szInterface);
 
-/* Gives an interface an address and takes it back (/sbin/ip). One address is stored: the one that was added last. */
+/* Gives an interface an address and takes it back (/sbin/ip). One address is stored: the one that was added last.
+ * Files: /etc/sysconfig/network-scripts, /etc/network.undo
+ * Runs: /sbin/ip
+ * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetIPv6AddrAdd(const char *szInterface, const char *szAddr, int nPrefix);
 TAVO_API int TAVONetIPv6AddrDel(const char *szInterface, const char *szAddr, int nPrefix);
 
 /* Pushes the addresses of an interface, as "ADDRESS/PREFIX", onto *ppAddrs, which may move (/proc/net/if_inet6). Returns
- * how many, or -1 with ERR_BAD_PARAMETERS or ERR_OUT_OF_MEMORY. */
+ * how many, or -1 with ERR_BAD_PARAMETERS or ERR_OUT_OF_MEMORY.
+ * Files: /proc/net/if_inet6 */
 TAVO_API int TAVONetIPv6AddrEnum(const char *szInterface, TLIBSZLIST **ppAddrs);
 
 /* Adds or removes the route to a network, in the kernel alone; "::" with the length 0 is the default route. szGateway is
- * the router's address, NULL for a network that the interface itself is on. */
+ * the router's address, NULL for a network that the interface itself is on.
+ * Runs: /sbin/ip
+ * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetIPv6RouteAdd(const char *szInterface, const char *szNet, int nPrefix, const char *szGateway);
 TAVO_API int TAVONetIPv6RouteDel(const char *szInterface, const char *szNet, int nPrefix, const char *szGateway);
 
@@ -269,13 +312,16 @@ TAVO_API int TAVONetDhcp6Wait(const char *szInterface, int cSeconds);
  * waking. Common codes: ERR_BAD_PARAMETERS, ERR_OP_FAILURE (the card or the controller refuses).
  */
 
-/* 1 when the interface wakes the appliance, 0 when it does not, -1 on error. */
+/* 1 when the interface wakes the appliance, 0 when it does not, -1 on error.
+ * Files: /etc/tavoinfo.conf, /etc.defaults/tavoinfo.conf */
 TAVO_API int TAVONetWolGet(const char *szInterface);
 
 /* Lets the interface wake the appliance (fEnable not 0; on which packets is said by "wol_enabled_options" in
  * /etc/tavoinfo.conf, letters as ethtool knows them, such as "g") or no more, and stores that as "NAME_wol_options". The
  * controller of a front panel cannot be told to stop, and is told under lock_ttys1. Returns 0, or -1 with ERR_KEY_NOT_FOUND or ERR_FORMAT_ERROR (no
- * options to enable, or letters that are none), ERR_LOCK_FAILED or a code of the settings files. */
+ * options to enable, or letters that are none), ERR_LOCK_FAILED or a code of the settings files.
+ * Files: /etc/tavoinfo.conf, /etc.defaults/tavoinfo.conf, /dev/ttyS1
+ * Locks: TAVO_LOCK_TTYS1 (exclusive, at most 5 s), TAVO_LOCK_TAVOINFO (exclusive, at most 5 s) */
 TAVO_API int TAVONetWolSet(const char *szInterface, int fEnable);
 
 /*
@@ -283,14 +329,16 @@ TAVO_API int TAVONetWolSet(const char *szInterface, int fEnable);
  */
 
 /* Pushes the names of the kernel's bonds onto *ppBonds, which may move (/sys/class/net/bonding_masters). Returns how many,
- * or -1 with ERR_BAD_PARAMETERS or ERR_OUT_OF_MEMORY. */
+ * or -1 with ERR_BAD_PARAMETERS or ERR_OUT_OF_MEMORY.
+ * Files: /sys/class/net/bonding_masters */
 TAVO_API int TAVONetLinkAggrEnum(TLIBSZLIST **ppBonds);
 
 /* The same for the member interfaces of a bond; 0 for a bond that is not there. */
 TAVO_API int TAVONetLinkAggrPhyGet(const char *szBond, TLIBSZLIST **ppMembers);
 
 /* Reads a bond from the kernel; one that is not there has the mode TAVO_NET_AGGR_NONE. Returns 0, or -1 with
- * ERR_BAD_PARAMETERS, or ERR_LINK_AGGR_OPTION when the kernel's bond has a mode that the appliance does not offer. */
+ * ERR_BAD_PARAMETERS, or ERR_LINK_AGGR_OPTION when the kernel's bond has a mode that the appliance does not offer.
+ * Files: /sys/class/net, /proc/net/bonding */
 TAVO_API int TAVONetLinkAggrGet(const char *szBond, TAVONETLINKAGGR *pAggr);
 
 /* Adds an interface to the members of a record; one that is there already stays once. Changes the record alone. Returns
@@ -304,7 +352,10 @@ TAVO_API int TAVONetLinkAggrOptSlsaveAdd(TAVONETLINKAGGR *pAggr, const char *szI
  * as asked. Wherever the process dies, the files describe a network that starts.
  * Returns 0, or -1 with ERR_BAD_PARAMETERS, ERR_LINK_AGGR_TYPE (szBond is an interface that is no bond), ERR_LOCK_FAILED,
  * ERR_READ_FAILED or ERR_WRITE_FAILED (the files are as they were, and the network is started) or ERR_OP_FAILURE (the
- * network did not start; the old files are back, and the old network was started). */
+ * network did not start; the old files are back, and the old network was started).
+ * Files: /etc/sysconfig/network-scripts, /etc/network.undo
+ * Runs: /etc/rc.network, /bin/cp, /bin/mv
+ * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetLinkAggrSet(const TAVONETLINKAGGR *pAggr);
 
 TAVO_END_DECLS

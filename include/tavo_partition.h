@@ -70,7 +70,8 @@ typedef struct PARTITIONFILTER {
 } PARTITIONFILTER;
 
 /* Returns 1 when partitions 1 and 2 of the disk have exactly the sectors and types of a layout with that RAID flag, and
- * writes its version to *pVersion unless that is NULL; 0 otherwise. The source is sfdisk. */
+ * writes its version to *pVersion unless that is NULL; 0 otherwise. The source is sfdisk.
+ * Runs: /sbin/sfdisk */
 TAVO_API int BlTAVOCheckPartitionLayout(const char *szDisk, int fRaid, int *pVersion);
 
 /* The index of the layout in grgAllTavoPartLayout; version 0 stands for the current one. -1, silently, without one. */
@@ -78,29 +79,38 @@ TAVO_API int TAVOPartitionLayoutIdxGet(int version, int fRaid);
 
 /* Gives the layout version of the system disks: that of a member of the system array /dev/md0; without such members that
  * of an internal disk; PARTITION_VERSION_CURRENT when none is recognised. Returns 0, or -1 when /sys/block/md0 cannot be
- * searched or pVersion is NULL. */
+ * searched or pVersion is NULL.
+ * Files: /sys/block/md0/md
+ * Runs: /sbin/sfdisk */
 TAVO_API int PartitionLayoutGet(int *pVersion);
 
 /* Creates partitions. flags are PARTITION_SYSTEM, PARTITION_DATA, see there (0: nothing is made); pVersion may be NULL for the version that
  * the system carries. What is on the disk is lost. Returns 0 or -1; nothing is changed while something uses the disk
- * (PARTITION_DATA: partition 3), which is logged. */
+ * (PARTITION_DATA: partition 3), which is logged.
+ * Files: /sys/class/block
+ * Runs: /sbin/sfdisk */
 TAVO_API int PartitionCreate(const char *szDisk, int flags, const int *pVersion);
 
 /* Empties entries of the table and erases RAID superblocks of the partitions. PARTITION_DATA empties partitions 15 down
  * to 3 (one that is not there is passed over) and erases the superblock of partition 3; PARTITION_SYSTEM does both for
  * partitions 1 and 2 and leaves an empty table, without partition 3 too. The superblock of another partition that is
  * emptied is erased first. Returns 0 or -1; nothing is changed while something uses one of the partitions that the call
- * empties (PARTITION_SYSTEM empties all), which is logged. */
+ * empties (PARTITION_SYSTEM empties all), which is logged.
+ * Files: /sys/class/block
+ * Runs: /sbin/sfdisk, /sbin/mdadm */
 TAVO_API int PartitionClean(const char *szDisk, int flags);
 
-/* Erases the RAID superblock of one partition. Returns 0 or -1. */
+/* Erases the RAID superblock of one partition. Returns 0 or -1.
+ * Runs: /sbin/mdadm */
 TAVO_API int PartitionCleanRAID(const char *szDisk, int nPartition);
 
-/* Writes an empty partition table. Returns 0 or -1. */
+/* Writes an empty partition table. Returns 0 or -1.
+ * Runs: /sbin/sfdisk */
 TAVO_API int PartitionAddTable(const char *szDisk);
 
 /* Returns the size of partition nPartition in sectors, and its start and type through the pointers, which may be NULL.
- * -1, silently, when there is no such partition or an argument is bad. szDisk may lack its "/dev/". */
+ * -1, silently, when there is no such partition or an argument is bad. szDisk may lack its "/dev/".
+ * Runs: /sbin/sfdisk */
 TAVO_API int64_t RCPartitionConfigs(int nPartition, const char *szDisk, int64_t *pnStart, uint32_t *pnType);
 
 /* Returns 1 when the partition szPath ("/dev/sda4") is of type 0x0F, extended, else 0. Types 0x05 and 0x85 do not count. */
@@ -111,7 +121,8 @@ TAVO_API int PartitionIsExtended(const char *szPath);
 TAVO_API int PartitionTableTypeGet(const char *szPath, int *pKind);
 
 /* Sorts the caller's list *ppList and adds the paths of all disks and partitions of /proc/partitions that pass the
- * filter. The list may move. Returns the number of items of the list, or -1 (the list may hold a part). */
+ * filter. The list may move. Returns the number of items of the list, or -1 (the list may hold a part).
+ * Files: /proc/partitions */
 TAVO_API int PartitionPathEnum(const PARTITIONFILTER *pFilter, TLIBSZLIST **ppList);
 
 /* Returns the partition index that holds the data of a known USB device with a fixed layout, -1 for any other device.

@@ -34,7 +34,8 @@ enum {
 /* Converts between units; 0 for a mode that is none of TAVO_UNIT_. Sets no code. */
 TAVO_API float TAVOUnitTrans(int mode, float value);
 
-/* 1 when "supportquota" is "yes" (any case) in /etc.defaults/tavoinfo.conf, else 0. */
+/* 1 when "supportquota" is "yes" (any case) in /etc.defaults/tavoinfo.conf, else 0.
+ * Files: /etc.defaults/tavoinfo.conf */
 TAVO_API int TAVOSupportQUOTA(void);
 
 /* Switches quotas on for the volume: remounts it with quotas, builds the quota files, has the kernel use them. A step
@@ -44,11 +45,15 @@ TAVO_API int TAVOSupportQUOTA(void);
  *   ERR_QUOTA_REMOUNT   the volume cannot be remounted
  *   ERR_QUOTA_CHECK     the quota files cannot be built; also when somebody is writing to the volume
  *   ERR_QUOTA_ON        the kernel does not take them
- *   ERR_QUOTA_SHELL     a command could not be run, or was killed */
+ *   ERR_QUOTA_SHELL     a command could not be run, or was killed
+ * Files: /proc/self/mounts
+ * Runs: /bin/mount, /sbin/quotacheck, /sbin/quotaon */
 TAVO_API int TAVOQuotaInit(int nVolume);
 
 /* Switches quotas off for the volume. Fails with ERR_BAD_PARAMETERS and ERR_QUOTA_SHELL as above, and with ERR_QUOTA_OFF
- * when quotaoff fails. */
+ * when quotaoff fails.
+ * Files: /proc/self/mounts
+ * Runs: /sbin/quotaoff */
 TAVO_API int TAVOQuotaOff(int nVolume);
 
 /* Sets the limit of a user, in megabytes, on the volume whose block device is szDevice; 0 takes the limit away. It is
@@ -61,7 +66,9 @@ TAVO_API int TAVOQuotaOff(int nVolume);
  *   ERR_FILE_NOT_FOUND      there is no such device
  *   ERR_QUOTA_BAD_ARGUMENT  the kernel refused the limit or the device
  *   ERR_SYS_UNKNOWN         the name is that of a group, or anything else went wrong
- * or as TAVOUserGet when the account cannot be looked up. */
+ * or as TAVOUserGet when the account cannot be looked up.
+ * Files: /etc/passwd, /tmp/.db.user.*
+ * Locks: TAVO_LOCK_USER (shared, at most 5 s) */
 TAVO_API int TAVOQuotaSet(const char *szUser, const char *szDevice, const float *prLimit);
 
 /* Reads limit and use of a user. Fails, *pQuota untouched, with
@@ -69,7 +76,9 @@ TAVO_API int TAVOQuotaSet(const char *szUser, const char *szDevice, const float 
  *   ERR_NO_SUCH_USER       there is no such user
  *   ERR_QUOTA_NOT_ENABLED  the volume has no quotas
  *   ERR_SYS_UNKNOWN        the name is that of a group, or anything else went wrong
- * or as TAVOUserGet when the account cannot be looked up. */
+ * or as TAVOUserGet when the account cannot be looked up.
+ * Files: /etc/passwd, /tmp/.db.user.*
+ * Locks: TAVO_LOCK_USER (shared, at most 5 s) */
 TAVO_API int TAVOQuotaGet(const char *szUser, const char *szDevice, TAVOQUOTA *pQuota);
 
 /* The number of the quota format that the kernel uses on the device: 1 (old), 2 (vfsv0), 4 (vfsv1). Fails with
@@ -77,11 +86,15 @@ TAVO_API int TAVOQuotaGet(const char *szUser, const char *szDevice, TAVOQUOTA *p
 TAVO_API int TAVOQuotaFmtGet(const char *szDevice);
 
 /* Takes away the limits of the listed users on one device; empty names are passed over. Goes on after a failure and
- * then fails with the code of the last one, as TAVOQuotaSet. ERR_BAD_PARAMETERS when the list is NULL. */
+ * then fails with the code of the last one, as TAVOQuotaSet. ERR_BAD_PARAMETERS when the list is NULL.
+ * Files: /etc/passwd, /tmp/.db.user.*
+ * Locks: TAVO_LOCK_USER (shared, at most 5 s) */
 TAVO_API int TAVOQuotaClean(const TLIBSZLIST *pslUsers, const char *szDevice);
 
 /* The same on every volume that is mounted with quotas for users (the mount options in /proc/self/mounts). Each volume
- * that fails is logged. ERR_READ_FAILED when the mounts cannot be read. */
+ * that fails is logged. ERR_READ_FAILED when the mounts cannot be read.
+ * Files: /proc/self/mounts, /etc/passwd, /tmp/.db.user.*
+ * Locks: TAVO_LOCK_USER (shared, at most 5 s) */
 TAVO_API int TAVOQuotaCleanAllVols(const TLIBSZLIST *pslUsers);
 
 TAVO_END_DECLS

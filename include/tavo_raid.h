@@ -115,7 +115,8 @@ typedef struct RAIDREQUEST {
  *   ERR_OPEN_FAILED      the device
  *   ERR_SIZE_UNKNOWN     the driver does not describe it
  *   ERR_UNKNOWN          its level is none of RAID_LEVEL_
- *   ERR_OUT_OF_MEMORY */
+ *   ERR_OUT_OF_MEMORY
+ * Files: /sys/block/mdN/md */
 TAVO_API int RAIDInfoGet(const char *szPath, RAIDINFO **ppInfo);
 
 /* A copy of the record with its members, for RAIDInfoFree. NULL with ERR_BAD_PARAMETERS or ERR_OUT_OF_MEMORY. */
@@ -124,11 +125,13 @@ TAVO_API void RAIDInfoFree(RAIDINFO *pInfo);
 
 /* Reads all arrays. Returns the number of records and puts the list, NULL for none, into *ppList, for RAIDListFree; -1
  * with *ppList NULL: ERR_BAD_PARAMETERS, or logged with a code of RAIDPathEnum or RAIDInfoGet. An array that goes while
- * it is read is passed over. */
+ * it is read is passed over.
+ * Files: /sys/block/mdN/md */
 TAVO_API int RAIDInfoEnum(RAIDLIST **ppList);
 
 /* Appends the paths of all arrays in /sys/block, by number, to the caller's list, which may move. Returns how many; -1
- * with ERR_BAD_PARAMETERS, ERR_OPEN_FAILED or ERR_OUT_OF_MEMORY. */
+ * with ERR_BAD_PARAMETERS, ERR_OPEN_FAILED or ERR_OUT_OF_MEMORY.
+ * Files: /sys/block/mdN/md */
 TAVO_API int RAIDPathEnum(TLIBSZLIST **ppList);
 
 /* Appends a node with pInfo, which then belongs to the list. Returns 0, or -1 with ERR_BAD_PARAMETERS or
@@ -175,50 +178,67 @@ TAVO_API int RAIDMdStripeSizeGet(const char *szPath);
 /* Reads the superblock of a member with "mdadm -E" into the caller's record. Returns 1 when mdadm said anything, which it
  * also does of a partition table: look at szUuid; 0 when it did not, with the record cleared; -1, logged, when it could
  * not be run; with ERR_BAD_PARAMETERS for a NULL argument or text that is no device. A line that cannot be understood is
- * logged and ends the reading. */
+ * logged and ends the reading.
+ * Runs: /sbin/mdadm */
 TAVO_API int RAIDSBGet(const char *szMember, RAIDSUPERBLOCK *pSuperblock);
 
 /* Reads the superblocks of several members as a heap array for free; those without one are left out. Returns their
- * number, 0 with *ppEntry NULL; -1 with ERR_BAD_PARAMETERS, ERR_OUT_OF_MEMORY, or as RAIDSBGet. */
+ * number, 0 with *ppEntry NULL; -1 with ERR_BAD_PARAMETERS, ERR_OUT_OF_MEMORY, or as RAIDSBGet.
+ * Runs: /sbin/mdadm */
 TAVO_API int RAIDSBEnum(const TLIBSZLIST *pslMembers, RAIDSBENTRY **ppEntry);
 
-/* Erases the superblock of a member. Returns 0 or -1, logged. */
+/* Erases the superblock of a member. Returns 0 or -1, logged.
+ * Runs: /sbin/mdadm */
 TAVO_API int RAIDSBClean(const char *szMember);
 
 /* Erases the superblocks of all disks and partitions that belong to the array with that UUID, in whole. Stop the array
  * first. pInfo is not looked at and may be NULL. Returns 0, or -1, logged, at the first failure; with ERR_BAD_PARAMETERS,
- * before any disk is touched, for text that is no UUID. */
+ * before any disk is touched, for text that is no UUID.
+ * Files: /proc/partitions
+ * Runs: /bin/grep, /sbin/mdadm */
 TAVO_API int RAIDSBCleanByUUID(const RAIDINFO *pInfo, const char *szUuid);
 
 /* Gives the UUID of a running array, from a member's superblock. Returns 1; 0 when no member has one; -1 with
- * ERR_BAD_PARAMETERS, ERR_NOT_ENOUGH_MEMORY (cbUuid is too small), or a code of RAIDInfoGet. */
+ * ERR_BAD_PARAMETERS, ERR_NOT_ENOUGH_MEMORY (cbUuid is too small), or a code of RAIDInfoGet.
+ * Runs: /sbin/mdadm */
 TAVO_API int RAIDUUIDGet(const char *szPath, char *szUuid, int cbUuid);
 
 /* Tells whether the disk szDisk ("/dev/sda") is a member of an array: by its partition 3 or 5, or as a whole, which only
  * counts for arrays above 100. Returns 1 and the array's number in *pnArray, which may be NULL; 0; -1 when a superblock
- * cannot be read, or with ERR_BAD_PARAMETERS. */
+ * cannot be read, or with ERR_BAD_PARAMETERS.
+ * Runs: /sbin/mdadm */
 TAVO_API int RAIDDiskIsUsedByRAID(const char *szDisk, int *pnArray);
 
 /* --- changing arrays. All return 0, or -1, logged; ERR_BAD_PARAMETERS for an argument that is no array or device --- */
 
-/* Creates an array and tunes it. What is on the members is lost. */
+/* Creates an array and tunes it. What is on the members is lost.
+ * Files: /sys/block/mdN/md
+ * Runs: /sbin/mdadm */
 TAVO_API int RAIDCreate(const RAIDREQUEST *pRequest);
 
 /* Starts an array from the members that carry its UUID, or from the members of a record. When not all members of the record
- * are there, but enough of them that the array is degraded, it is started by their UUID. */
+ * are there, but enough of them that the array is degraded, it is started by their UUID.
+ * Files: /sys/block/mdN/md
+ * Runs: /sbin/mdadm */
 TAVO_API int RAIDAssemble(const char *szPath, const char *szUuid);
 TAVO_API int RAIDAssembleByInfo(const RAIDINFO *pInfo);
 
-/* Stops an array; its members keep their superblocks. */
+/* Stops an array; its members keep their superblocks.
+ * Files: /sys/block/mdN/md
+ * Runs: /sbin/mdadm */
 TAVO_API int RAIDStop(const char *szPath);
 
 /* Stops an array and erases the superblocks of its members. Also of a list; one that does not exist is passed over, and
- * the others are removed also when one fails. */
+ * the others are removed also when one fails.
+ * Files: /sys/block/mdN/md
+ * Runs: /sbin/mdadm */
 TAVO_API int RAIDRemove(const RAIDINFO *pInfo);
 TAVO_API int RAIDRemoveMultiple(const TLIBSZLIST *pslPaths);
 
 /* Adds a member: as a spare, which is rebuilt onto when one is missing; to a linear array at its end. Impossible for
- * RAID 0. Of the record the path and level are used. */
+ * RAID 0. Of the record the path and level are used.
+ * Files: /sys/block/mdN/md
+ * Runs: /sbin/mdadm */
 TAVO_API int RAIDAdd(const RAIDINFO *pInfo, const char *szMember);
 
 /* The same, after a look whether the member is large enough:
@@ -228,7 +248,9 @@ TAVO_API int RAIDAdd(const RAIDINFO *pInfo, const char *szMember);
 TAVO_API int RAIDAddRobustCheck(const RAIDINFO *pInfo, const char *szMember);
 
 /* Removes a failed or spare member, and makes sure that it is gone. A member whose disk was pulled has no node any more;
- * its path is "/dev/" and the name that the kernel keeps for it, and it is removed whatever its state. */
+ * its path is "/dev/" and the name that the kernel keeps for it, and it is removed whatever its state.
+ * Files: /sys/block/mdN/md
+ * Runs: /sbin/mdadm */
 TAVO_API int RAIDRemoveDisk(const RAIDINFO *pInfo, const char *szMember);
 
 /* Puts a new disk into the place of a member of a RAID 1, 5, 6 or 10; the rebuild begins, RAIDRebuildingWait waits for it.
@@ -241,15 +263,21 @@ TAVO_API int RAIDRemoveDisk(const RAIDINFO *pInfo, const char *szMember);
  *   ERR_NOT_ENOUGH_SPACE   the new disk is too small; nothing has changed
  *   ERR_SYS_UNKNOWN        mdadm did not take the new member; the old one is gone and the disk partitioned
  * -1 without a code, logged, with nothing changed: the choice of the old one is not clear or it is in order, the new disk
- * is in use, or no other member's disk shows how to partition it. */
+ * is in use, or no other member's disk shows how to partition it.
+ * Files: /sys/block/mdN/md
+ * Runs: /sbin/mdadm */
 TAVO_API int RAIDReplaceDisk(const RAIDINFO *pInfo, const char *szOld, const char *szNew);
 
-/* Changes the number of slots. */
+/* Changes the number of slots.
+ * Files: /sys/block/mdN/md
+ * Runs: /sbin/mdadm */
 TAVO_API int RAIDDevCountChange(const RAIDINFO *pInfo, int nSlot);
 
 /* Turns a RAID 5 into a RAID 6 with new members. With more than one it waits for the first one's rebuild, adds the others
  * and sets the number of slots to the number of new members minus 1, which mdadm refuses when that is fewer than before.
- * -1 with nothing changed when a new member is in use or too small. */
+ * -1 with nothing changed when a new member is in use or too small.
+ * Files: /sys/block/mdN/md/level (written)
+ * Runs: /sbin/mdadm, /bin/echo */
 TAVO_API int RAIDMigrate2RAID6(const RAIDINFO *pInfo, const TLIBSZLIST *pslMembers);
 
 /* Tells whether all members have room to use more of: returns 1 and the size to use on each, in KiB; 0; or -1 when a
@@ -259,10 +287,14 @@ TAVO_API int RAIDExpansible(const RAIDINFO *pInfo, uint64_t *pcKibMember);
 /* Gives the size in bytes that the array can grow to, or has. */
 TAVO_API int RAIDSizeUnallocGet(const RAIDINFO *pInfo, uint64_t *pcbArray);
 
-/* Sets the stripe cache of a RAID 5 or RAID 6 to what suits the appliance; leaves other levels alone. */
+/* Sets the stripe cache of a RAID 5 or RAID 6 to what suits the appliance; leaves other levels alone.
+ * Files: /sys/block/mdN/md (written)
+ * Runs: /bin/echo */
 TAVO_API int TAVORAIDMdTuningPerformance(const char *szPath);
 
-/* Sets the stripe cache, in entries. An array without one is no failure. */
+/* Sets the stripe cache, in entries. An array without one is no failure.
+ * Files: /sys/block/mdN/md (written)
+ * Runs: /bin/echo */
 TAVO_API int TAVORAIDMdStripeCacheSizeSet(const char *szPath, int nEntry);
 
 /* Switches the remapping of bad sectors on or off, for all arrays. Only the appliance's kernel has the switch. */

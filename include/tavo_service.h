@@ -149,7 +149,8 @@ TAVO_API int TAVOServiceVolumeGetbyLink(const char *szLink, char *szVolume, int 
 
 /* 1 when the enable key of data folder idShare is "yes" in /etc/tavoinfo.conf, in any case of letters; else 0. For the
  * download scheduler (4) the answer comes from its own settings, /usr/tavo/etc/download.conf: 0 when the key is missing;
- * when the file cannot be read, 0 with ERR_OPEN_FAILED or another code of TLIBFileGetKeyValue. ERR_BAD_PARAMETERS: bad id. */
+ * when the file cannot be read, 0 with ERR_OPEN_FAILED or another code of TLIBFileGetKeyValue. ERR_BAD_PARAMETERS: bad id.
+ * Files: /etc/tavoinfo.conf, /usr/tavo/etc/download.conf */
 TAVO_API int TAVOServiceEnableGet(int idShare);
 
 /* 1 when service id is enabled, bound and running, as its status handler has it; else 0. ERR_BAD_PARAMETERS: bad id, or

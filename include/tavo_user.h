@@ -108,7 +108,10 @@ TAVO_API void TAVOUserFree(TAVOUSER *pUser);
  *   ERR_BAD_PARAMETERS    ppUser is NULL, or the name NULL or empty
  *   ERR_NO_SUCH_USER      there is no such account
  *   ERR_INVALID_USERNAME  the name cannot be converted, or the stored line has an empty one
- *   ERR_FORMAT_ERROR      a stored line has the wrong number of fields */
+ *   ERR_FORMAT_ERROR      a stored line has the wrong number of fields
+ * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.* (rebuilt where
+ *   they are not current)
+ * Locks: TAVO_LOCK_USER (shared, at most 5 s) */
 TAVO_API int TAVOUserGet(const char *szName, TAVOUSER **ppUser);
 TAVO_API int TAVOUserGetByUID(int uid, TAVOUSER **ppUser);
 
@@ -118,29 +121,43 @@ TAVO_API int TAVOUserGetByUID(int uid, TAVOUSER **ppUser);
  * ByPrefix and BySubstr list only names that begin with, or hold, szText, without regard to case; "" selects all.
  * Fails with
  *   ERR_BAD_PARAMETERS  ppList, *ppList or szText is NULL, or no flag is set
- *   ERR_ENUM_FAILED     the database cannot be walked */
+ *   ERR_ENUM_FAILED     the database cannot be walked
+ * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.* (rebuilt where
+ *   they are not current)
+ * Locks: TAVO_LOCK_USER (shared, at most 5 s) */
 TAVO_API int TAVOUserEnum(TLIBSZLIST **ppList, int flags);
 TAVO_API int TAVOUserEnumByPrefix(TLIBSZLIST **ppList, int flags, const char *szText);
 TAVO_API int TAVOUserEnumBySubstr(TLIBSZLIST **ppList, int flags, const char *szText);
 
-/* The number of names that TAVOUserEnum would append. Fails as it does. */
+/* The number of names that TAVOUserEnum would append. Fails as it does.
+ * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.* (rebuilt where
+ *   they are not current)
+ * Locks: TAVO_LOCK_USER (shared, at most 5 s) */
 TAVO_API int TAVOUserTotalNum(int flags);
 
 /* How many more accounts may be created: "maxaccounts" of /etc.defaults/tavoinfo.conf less the accounts that exist; 0
  * when the key is there but empty. It is negative when there are more than that.
  * Returns -1 with a code when the file or the key cannot be read; -1 also means one account too many, and then the code
- * stays as it was. */
+ * stays as it was.
+ * Files: /etc.defaults/tavoinfo.conf, /tmp/.db.user.*
+ * Locks: TAVO_LOCK_USER (shared, at most 5 s) */
 TAVO_API int TAVOConfGetUserLimit(void);
 
 /* The application privilege bits of an account: 0x3F for "admin", 0 for "guest", 0x23 for a domain account; else as
- * stored. Fails as TAVOUserGet. */
+ * stored. Fails as TAVOUserGet.
+ * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.* (rebuilt where
+ *   they are not current)
+ * Locks: TAVO_LOCK_USER (shared, at most 5 s) */
 TAVO_API int TAVOUserPrivilegeGet(const char *szName);
 
 /* Joins those of the names (an array that ends with NULL) that are existing accounts with "," into szBuf, in their
  * order and spelling. Returns the length with its NUL; szBuf NULL with cbBuf 0 asks for it.
  * Fails with
  *   ERR_BAD_PARAMETERS     rgszName is NULL, cbBuf negative, or szBuf NULL with a cbBuf other than 0
- *   ERR_NOT_ENOUGH_MEMORY  the buffer is too small; it is untouched */
+ *   ERR_NOT_ENOUGH_MEMORY  the buffer is too small; it is untouched
+ * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.* (rebuilt where
+ *   they are not current)
+ * Locks: TAVO_LOCK_USER (shared, at most 5 s) */
 TAVO_API int TAVOUserGetValidUserList(const char *const *rgszName, char *szBuf, int cbBuf);
 
 /*
@@ -167,23 +184,41 @@ TAVO_API int TAVOUserGetValidUserList(const char *const *rgszName, char *szBuf, 
  *   ERR_WRITE_FAILED, ERR_NOT_ENOUGH_SPACE  the files cannot be written, or would lose an account that they have
  *   ERR_RENAME_FAILED     a file cannot be moved into place; when others were before it, the next call finishes that
  *   ERR_DB_STORE, ERR_DB_DELETE  the database cannot be changed
- * and with ERR_UNLOCK_FAILED when all was done but the locks could not be released. */
+ * and with ERR_UNLOCK_FAILED when all was done but the locks could not be released.
+ * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*, /etc/group,
+ *   /usr/tavo/etc/smb.conf, /usr/tavo/etc/share.conf, /usr/tavo/etc/afpd.conf, /etc/ftpchroot,
+ *   /etc/.tavoaccount.commit
+ * Runs: /bin/mv
+ * Locks: TAVO_LOCK_USER (exclusive, at most 5 s), TAVO_LOCK_GROUP (exclusive), TAVO_LOCK_SMB (exclusive) */
 TAVO_API int TAVOUserSet(const char *const *rgszOldName, const TAVOUSER *const *rgpUser, int nUser);
 
 /* TAVOUserSet for one user; a NULL record is ERR_BAD_PARAMETERS and -1. Like a batch it returns 0 when the entry itself
- * was refused: clear the error code before the call and look at it afterwards. */
+ * was refused: clear the error code before the call and look at it afterwards.
+ * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*, /etc/group,
+ *   /usr/tavo/etc/smb.conf, /usr/tavo/etc/share.conf, /usr/tavo/etc/afpd.conf, /etc/ftpchroot,
+ *   /etc/.tavoaccount.commit
+ * Runs: /bin/mv
+ * Locks: TAVO_LOCK_USER (exclusive, at most 5 s), TAVO_LOCK_GROUP (exclusive), TAVO_LOCK_SMB (exclusive) */
 TAVO_API int TAVOUserSetOne(const char *szOldName, const TAVOUSER *pUser);
 
 /* Stores hashes that were computed elsewhere: rgszHash for the shadow file, rgszLmHash and rgszNtHash (32 hexadecimal
  * digits each) for Samba. Of a record only the name is used; an entry with a NULL record, name or hash is skipped, one
  * that fails is logged and skipped. Everything else about the account stays as it is.
- * Returns 0, or -1 with ERR_BAD_PARAMETERS (an array is NULL, nUser is negative) or as TAVOUserSet. */
+ * Returns 0, or -1 with ERR_BAD_PARAMETERS (an array is NULL, nUser is negative) or as TAVOUserSet.
+ * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*,
+ *   /etc/.tavoaccount.commit
+ * Locks: TAVO_LOCK_USER (exclusive, at most 5 s) */
 TAVO_API int TAVOUserSetPasswd(const TAVOUSER *const *rgpUser, const char *const *rgszHash,
                                const char *const *rgszLmHash, const char *const *rgszNtHash, int nUser);
 
 /* Deletes the named users in one batch of nUser: their quotas, SMB connections, Samba and group entries and home
  * folders too. "root" and "admin" (any case) and NULL are refused with ERR_USER_DB_DELETE, that entry only; domain
- * names and names that do not exist are skipped. Returns 0, or -1 as TAVOUserSet. */
+ * names and names that do not exist are skipped. Returns 0, or -1 as TAVOUserSet.
+ * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*, /etc/group,
+ *   /usr/tavo/etc/smb.conf, /usr/tavo/etc/share.conf, /usr/tavo/etc/afpd.conf, /etc/ftpchroot,
+ *   /etc/.tavoaccount.commit
+ * Runs: /usr/bin/smbstatus, /usr/bin/smbcontrol
+ * Locks: TAVO_LOCK_USER (exclusive, at most 5 s), TAVO_LOCK_GROUP (exclusive), TAVO_LOCK_SMB (exclusive) */
 TAVO_API int TAVOUserDelete(const char *const *rgszName, int nUser);
 
 /*
@@ -192,10 +227,13 @@ TAVO_API int TAVOUserDelete(const char *const *rgszName, int nUser);
 
 /* 1 when the day (days since 1970-01-01 UTC) has passed, else 0; a negative day never passes. An account is valid
  * through the whole local day. The time zone is the first line of /etc/TZ, which is put into the TZ variable of the
- * process; it stays there. */
+ * process; it stays there.
+ * Files: /etc/TZ */
 TAVO_API int TAVOUserIsExpired(int day);
 
-/* The same of an account: 1, 0, or -1 as TAVOUserGet. */
+/* The same of an account: 1, 0, or -1 as TAVOUserGet.
+ * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*, /etc/TZ
+ * Locks: TAVO_LOCK_USER (shared, at most 5 s) */
 TAVO_API int TAVOUserCheckExpired(const char *szName);
 
 /* Sets the record's expiry from "yyyy/mm/dd"; a date before 1970 becomes day 24855. Fails, the record untouched, with
@@ -230,12 +268,14 @@ TAVO_API char TAVOUserRandomNumMap2Seed(int n);
  */
 
 /* The next free user id, 1024 to 3072: behind the one handed out last ("#CURRENT_UID"), round the end, never one that
- * is in use. Fails with ERR_BAD_PARAMETERS (no uid store), ERR_DB_CURSOR (it cannot be read), ERR_TOO_MANY_USERS. */
+ * is in use. Fails with ERR_BAD_PARAMETERS (no uid store), ERR_DB_CURSOR (it cannot be read), ERR_TOO_MANY_USERS.
+ * Files: /tmp/.db.user.* */
 TAVO_API int TAVOUserDBGetFreeUid(TAVOUSERDB *pDb);
 
 /* Writes one account into the open stores: a new one when szOldName is NULL, else in place of that one. pUser must
  * name a user id and a group id. Nothing is stored when it fails with one of the codes of TAVOUserSet's entries; a domain
- * account is left alone, with 0. The files are not written: TAVOUserDBDump does. */
+ * account is left alone, with 0. The files are not written: TAVOUserDBDump does.
+ * Files: /tmp/.db.user.* */
 TAVO_API int TAVOUserDBSet(TAVOUSERDB *pDb, const char *szOldName, const TAVOUSER *pUser);
 
 /* Writes the four files anew from the open stores and records their modification times there. A file keeps its owner,
@@ -245,10 +285,13 @@ TAVO_API int TAVOUserDBSet(TAVOUSERDB *pDb, const char *szOldName, const TAVOUSE
  *   ERR_OPEN_FAILED       a temporary file cannot be created
  *   ERR_WRITE_FAILED      one cannot be written, or an account would be lost
  *   ERR_NOT_ENOUGH_SPACE  the disk is full
- *   ERR_RENAME_FAILED     a file cannot be moved into place */
+ *   ERR_RENAME_FAILED     a file cannot be moved into place
+ * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*,
+ *   /etc/.tavoaccount.commit */
 TAVO_API int TAVOUserDBDump(TAVOUSERDB *pDb);
 
-/* Removes the temporary files beside the four. Returns 0, or -1 with ERR_REMOVE_FAILED. */
+/* Removes the temporary files beside the four. Returns 0, or -1 with ERR_REMOVE_FAILED.
+ * Files: /etc/passwd.tmp, /etc/shadow.tmp, /etc/tavouser.conf.tmp, /usr/tavo/etc/private/smbpasswd.tmp */
 TAVO_API int TAVOUserRemoveTmpFiles(void);
 
 TAVO_END_DECLS

@@ -1,4 +1,5 @@
 """The pages that are made from the public headers: complete, silent under man's warnings, and without dead links."""
+import dataclasses
 import html.parser
 import pathlib
 import re
@@ -37,6 +38,13 @@ class Reading(unittest.TestCase):
         self.assertEqual(set(names), headers.map_names())
         self.assertEqual([(entry.name, lack) for entry, page in pages.pages()
                           for lack in pages.wanting(entry, page, names, known)], [])
+
+    def test_a_program_that_the_page_does_not_name_is_found(self):
+        names, known = headers.names(), headers.codes()
+        entry = dataclasses.replace(names["RCPartitionConfigs"])
+        entry.comment = headers.Comment(entry.comment.text)
+        self.assertIn('uses /sbin/sfdisk, which neither "Files:" nor "Runs:" names',
+                      pages.wanting(entry, pages.page_of(entry, names, known), names, known))
 
     def test_a_name_without_its_contract_is_found(self):
         names, known = headers.names(), headers.codes()

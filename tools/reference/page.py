@@ -3,13 +3,14 @@ import dataclasses
 import re
 
 import headers
+import sources
 
 # Where a comment turns from what a function does to what it returns.
 _RESULT = re.compile(
     r"(?:^|(?<=[.;:] )|(?<=\n))(?=(?:Returns?|Both return|They return|Fails|NULL with|NULL,|-1 with|-1,|-1:)\b|-1 with)")
 # Where the comment of a section or a header speaks of what each of its functions returns.
 _SHARED = re.compile(r"\b(?:fail with|[Rr]eturns?|[Cc]ommon codes)\b")
-_PATH = re.compile(r"(?<![\w.<\"])/(?:etc|etc\.defaults|tmp|var|usr|sys|proc|dev|sbin|bin)(?:/[\w.{}*-]+)+")
+_PATH = re.compile(r"(?<![\w.<\"])/(?:etc|etc\.defaults|tmp|var|usr|sys|proc|dev)(?:/[\w.{}*-]+)+")
 
 
 @dataclasses.dataclass
@@ -166,6 +167,9 @@ def wanting(entry, page, names, known_codes):
     for item in _list(entry, "Files") + _list(entry, "Runs"):
         if not item.startswith("/"):
             lacks.append(f"a file or program without its whole path: {item}")
+    for path in sorted(sources.paths().get(entry.name, ())):
+        if sources.unnamed(path, _list(entry, "Files") + _list(entry, "Runs")):
+            lacks.append(f"uses {path}, which neither \"Files:\" nor \"Runs:\" names")
     for item in _list(entry, "Locks"):
         if item.split(" ")[0] not in {name for name, *_ in _lock_names()} | {"none"}:
             lacks.append(f"names a lock that does not exist: {item}")
