@@ -95,6 +95,7 @@ TAVO_API int TAVOBDbGet(TAVOBDB *pDb, const void *pKey, int cbKey, void **ppValu
  * Returns 0, or -1 with
  *   ERR_BAD_PARAMETERS    an argument is NULL, cbKey is below 1 or cbValue negative
  *   ERR_NOT_ENOUGH_SPACE  the disk is full
+ *   ERR_OUT_OF_MEMORY     no memory: the store may be damaged
  *   ERR_DISK_IO_FAILED, ERR_DB_INTERRUPTED, ERR_DB_STORE  input/output error, interrupted, anything else */
 TAVO_API int TAVOBDbSet(TAVOBDB *pDb, const void *pKey, int cbKey, const void *pValue, int cbValue);
 
@@ -103,6 +104,7 @@ TAVO_API int TAVOBDbSet(TAVOBDB *pDb, const void *pKey, int cbKey, const void *p
  *   ERR_BAD_PARAMETERS    an argument is NULL, or cbKey is below 1
  *   ERR_KEY_NOT_FOUND     there is no such key
  *   ERR_NOT_ENOUGH_SPACE  the disk is full
+ *   ERR_OUT_OF_MEMORY     no memory: the store may be damaged
  *   ERR_DISK_IO_FAILED, ERR_DB_INTERRUPTED, ERR_DB_DELETE  input/output error, interrupted, anything else */
 TAVO_API int TAVOBDbDelete(TAVOBDB *pDb, const void *pKey, int cbKey);
 

@@ -20,7 +20,25 @@ void Des(const uint8_t key[8], const uint8_t block[8], uint8_t out[8]) noexcept;
 void Md4(const uint8_t *data, size_t length, uint8_t digest[16]) noexcept;
 
 void *OpenBtree(const char *path, int flags, int mode, bool parameters) noexcept;
+int CloseBtree(void *store) noexcept;
 void SyncBy(int (*sync)(int fd)) noexcept;
+
+// While one of these lives, the database opens, closes and allocates through us: without memory for its environment it would
+// crash, a file that cannot be closed it closes twice, and one that cannot be set up it leaves open.
+class DatabaseCall {
+  public:
+    DatabaseCall() noexcept;
+    ~DatabaseCall();
+    DatabaseCall(const DatabaseCall &) = delete;
+    DatabaseCall &operator=(const DatabaseCall &) = delete;
+
+    bool Reserve() noexcept;          // what an open needs to fail as it should; false without memory
+    int CloseError() const noexcept;  // of a file that was closed; 0 for none
+    void CloseLeft() noexcept;        // what was opened and not closed
+
+  private:
+    bool is_owner_;
+};
 
 }  // namespace tavo::extras
 

@@ -5,6 +5,7 @@
 #include <cstddef>
 #include <cstring>
 #include <new>
+#include <utility>
 
 #include <dlfcn.h>
 #include <execinfo.h>
@@ -27,6 +28,7 @@ namespace {
 
 struct Armed {
     bool on = false;
+    bool paused = false;
     int until_failure = 0;
     bool fired = false;
     int live = 0;
@@ -37,10 +39,15 @@ struct Armed {
 
 constinit thread_local Armed armed;
 
+bool IsOn()
+{
+    return armed.on && !armed.paused;
+}
+
 // True for the allocation that is to fail.
 bool Fails()
 {
-    if (!armed.on)
+    if (!IsOn())
         return false;
     if (--armed.until_failure == 0) {
         armed.fired = true;
@@ -58,7 +65,7 @@ bool Fails()
 
 void *Counted(void *block)
 {
-    armed.live += armed.on && block;
+    armed.live += IsOn() && block;
     return block;
 }
 
@@ -88,6 +95,11 @@ void EachAllocation::Disarm()
 #else
     left_allocated_ = armed.live;
 #endif
+}
+
+bool PauseFailing(bool paused) noexcept
+{
+    return std::exchange(armed.paused, paused);
 }
 
 void StartCounting()
@@ -137,6 +149,7 @@ int StopCounting()
 using test::armed;
 using test::Counted;
 using test::Fails;
+using test::IsOn;
 
 extern "C" {
 
@@ -159,7 +172,7 @@ void *realloc(void *block, size_t size)
 
 void free(void *block)
 {
-    armed.live -= armed.on && block;
+    armed.live -= IsOn() && block;
     REAL(free)(block);
 }
 }

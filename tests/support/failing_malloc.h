@@ -51,6 +51,9 @@ bool AllocationFailed();
 bool FailedInside(const char *object);  // whether a library of that name was on the stack of the failed allocation
 int StopCounting();                     // blocks allocated since StartCounting less blocks freed
 
+// For what the test itself allocates inside the call: neither fails nor counts. Whether it was paused before.
+bool PauseFailing(bool paused) noexcept;
+
 }  // namespace test
 
 #endif

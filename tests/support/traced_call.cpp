@@ -51,6 +51,10 @@ constexpr NamedCall kNames[] = {
     ROW(sync),           ROW(tgkill),       ROW(umask),      ROW(uname),
     ROW(unlink),         ROW(unlinkat),     ROW(utimensat),  ROW(vfork),
     ROW(wait4),          ROW(waitid),       ROW(write),      ROW(writev),
+    ROW(mkdirat),        ROW(renameat),
+#ifdef SYS_newfstatat
+    ROW(newfstatat),
+#endif
 };
 #undef ROW
 

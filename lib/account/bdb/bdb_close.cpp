@@ -12,9 +12,9 @@ extern "C" int TAVOBDbClose(TAVOBDB *pDb)
     if (!pDb)
         return Fail(ERR_BAD_PARAMETERS);
     const std::unique_ptr<tavo::Btree> store(tavo::Btree::Of(pDb));
-    if (const int code = store->Close()) {
+    if (store->Close() != 0) {
         LogError("%s:%d Failed to close a store, errno=%d", errno);
-        return Fail(code);
+        return Fail(ERR_DB_CLOSE);
     }
     return 0;
 }

@@ -10,22 +10,13 @@
 #include "account/detail/samba_lock.h"
 #include "account/detail/store_family.h"
 #include "core/detail/file_rewrite.h"
+#include "core/detail/owner.h"
 
 #include <string>
 #include <string_view>
 #include <vector>
 
 namespace tavo {
-
-// Completes the moves of account files that a dead process left half done, and those of neighbours' files that nobody has
-// changed since. `marker` becomes what is left to do. 0, ERR_READ_FAILED or ERR_RENAME_FAILED.
-int ResumeCommit(Marker &marker);
-
-// The part of that which a reader needs: the account files. The marker stays for the next change when more follows.
-int FinishAccountFiles();
-
-// Removes the temporary files of a family, unless a commit is to be completed with them. 0 or ERR_REMOVE_FAILED.
-int RemoveTemporaries(const StoreFamily &family);
 
 class AccountCommit {
   public:
@@ -53,22 +44,28 @@ class AccountCommit {
     Marker &Steps() { return marker_; }
     const Marker &Steps() const { return marker_; }
 
-    // All files must have been written. 0, ERR_WRITE_FAILED or ERR_NOT_ENOUGH_SPACE with nothing moved, or with a single
-    // file moved that may not outlive a power failure; ERR_RENAME_FAILED with nothing moved, or with the rest left to
-    // ResumeCommit. Neighbours' files that could not be moved are pending in the steps.
+    // All files must have been written. 0; ERR_WRITE_FAILED or ERR_NOT_ENOUGH_SPACE with nothing moved; ERR_RENAME_FAILED
+    // with nothing moved, or with the rest left to ResumeCommit. Neighbours' files that could not be moved are pending in
+    // the steps.
     int Commit();
+
+    // Whether the last Commit also made its renames durable. They have taken place even if not.
+    bool IsSynced() const { return synced_; }
 
     // To be called when the steps have been taken, as far as they could be: `steps` is what is left. Never fails: a marker
     // that could not be replaced says to do again what was done, and that does nothing.
     void Settle() noexcept;
 
   private:
+    Fd Begin(FileStep step, bool makes_folder);  // the temporary file of a step, which joins the list
+    void Complete();                             // the last one is written
     int CommitOne();
     int CommitAll();
     bool MoveAll(bool &moved);
 
     Marker marker_;
     SambaLock samba_;
+    bool synced_ = true;
     bool decided_ = false;  // the temporary files belong to the marker
 };
 

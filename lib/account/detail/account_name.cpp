@@ -6,6 +6,7 @@
 #include "core/detail/keep_fault.h"
 
 #include <algorithm>
+#include <new>
 
 namespace tavo {
 namespace {
@@ -48,6 +49,11 @@ bool IsDomainName(std::string_view name)
     return name.find('\\') != std::string_view::npos;
 }
 
+bool IsDomainEntry(std::string_view key, std::string_view value, StoreContents contents)
+{
+    return IsDomainName(contents == StoreContents::kIndex ? value : key);
+}
+
 std::optional<std::string> AccountKey(std::string_view name, size_t key_size)
 {
     std::string key(name);
@@ -60,7 +66,10 @@ std::optional<std::string> AccountKey(std::string_view name, size_t key_size)
     }
     const KeepFault keep;
     std::string upper(key_size, '\0');
+    tavoerrno = 0;
     const int length = TLIBUnicodeUTF8StrUpper(key.c_str(), upper.data(), static_cast<int>(upper.size()));
+    if (length <= 0 && tavoerrno == ERR_OUT_OF_MEMORY)
+        throw std::bad_alloc();  // as a name without a key an account would get a store's entry that nobody finds
     if (length <= 0)
         return std::nullopt;
     upper.resize(static_cast<size_t>(length));

@@ -23,6 +23,12 @@ bool IsDotName(std::string_view name);
 
 bool IsDomainName(std::string_view name);  // holds a backslash
 
+// What the entries of a store are: lines by names, or names by ids.
+enum class StoreContents { kLines, kIndex };
+
+// Whether an entry of a store is about a domain account. A description may hold a backslash, too.
+bool IsDomainEntry(std::string_view key, std::string_view value, StoreContents contents);
+
 // Keys and values of the stores end in a NUL.
 inline std::string WithNul(std::string_view text)
 {

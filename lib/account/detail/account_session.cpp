@@ -26,8 +26,8 @@ constexpr int kLockSeconds = 5;
 AccountSession::~AccountSession()
 {
     KeepErrno keep;
-    stores_.clear();
     const KeepFault keep_fault;
+    stores_.clear();
     Unlock();
 }
 
@@ -97,7 +97,7 @@ int AccountSession::Merge()
     if (!ReadContent(kind_, content))
         return ERR_READ_FAILED;
     for (size_t i = 0; i < stores_.size(); ++i)
-        if (const int code = stores_[i]->TakeOver(content.stores[i]))
+        if (const int code = stores_[i]->TakeOver(content.stores[i], ContentsOf(kind_, i)))
             return code;
     texts_ = std::move(now);
     return 0;
@@ -155,8 +155,8 @@ int AccountSession::Open(std::span<const size_t> stores)
     stores_.resize(kind_.family.stores.size());
     for (const size_t index : stores) {
         const char *path = kind_.family.stores[index].path;
-        if (Btree::Open(path, {O_RDWR, true, 0}, stores_[index]) != 0)
-            return ERR_OPEN_FAILED;
+        if (const int code = Btree::Open(path, {O_RDWR, true, 0}, stores_[index]))
+            return CodeOfStores(code);
     }
     return 0;
 }

@@ -2,6 +2,7 @@
 #include "account/detail/account_transaction.h"
 
 #include "account/detail/account_name.h"
+#include "account/detail/commit_resume.h"
 #include "account/detail/group_accounts.h"
 #include "account/detail/group_dump.h"
 #include "account/detail/group_members.h"
@@ -145,8 +146,10 @@ int AccountTransaction::ComposeMembers(const std::vector<NameStep> &steps)
         code = ComposeGroups(GroupDb(*groups), commit_, kMemberLists, report);
     if (code != 0)
         commit_.Withdraw(kMemberLists);
-    else if (changed)
+    if (code == 0 && changed) {
+        LogDroppedGroups(report, where_);
         groups_ = std::move(groups);
+    }
     return code;
 }
 
@@ -185,6 +188,8 @@ int AccountTransaction::Commit()
     if (const int code = commit_.Commit())
         return code;
     // The change has happened. What fails from here on, for want of memory too, is left to the next one.
+    if (!commit_.IsSynced())
+        LogError("%s:%d Failed to sync the folders of the account files, errno=%d", errno);
     try {
         SealGroups();
         groups_.reset();
@@ -268,13 +273,17 @@ void AccountTransaction::ForgetDone(const std::vector<std::string> &stages, cons
         !marker.files.empty())
         return;
     AccountCommit left(std::move(marker));
-    std::erase_if(left.Steps().stages, [&](const std::string &stage) {
-        return std::find(stages.begin(), stages.end(), stage) != stages.end();
-    });
-    std::erase_if(left.Steps().homes, [&](const HomeStep &step) {
+    std::vector<HomeStep> &homes = left.Steps().homes;
+    std::erase_if(homes, [&](const HomeStep &step) {
         return std::any_of(moved.begin(), moved.end(), [&](const HomeStep &done) {
             return done.inode == step.inode && done.name == step.name && done.kind == step.kind;
         });
+    });
+    // A folder that could not be put aside needs the stage again.
+    const bool is_needed =
+        std::any_of(homes.begin(), homes.end(), [](const HomeStep &step) { return step.kind == HomeStep::kRemove; });
+    std::erase_if(left.Steps().stages, [&](const std::string &stage) {
+        return !is_needed && std::find(stages.begin(), stages.end(), stage) != stages.end();
     });
     left.Settle();
 }

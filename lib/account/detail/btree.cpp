@@ -1,8 +1,7 @@
-// Reads, changes and walks one open store.
+// Reads, changes, walks and closes one open store.
 #include "account/detail/btree.h"
 
-#include "account/detail/btree_file.h"
-#include "account/detail/free_name.h"
+#include "account/detail/account_name.h"
 #include "account/detail/store_seal.h"
 #include "account/detail/store_sync.h"
 #include "core/detail/extras.h"
@@ -10,9 +9,6 @@
 
 #include <cstring>
 #include <vector>
-
-#include <fcntl.h>
-#include <sys/stat.h>
 
 #include <db_185.h>
 
@@ -52,26 +48,6 @@ int CodeOf(int reason, int other)
     }
 }
 
-int OpenCode(int reason)
-{
-    switch (reason) {
-    case ENOMEM:
-        return ERR_OUT_OF_MEMORY;
-    case EACCES:
-    case EPERM:
-        return ERR_ACCESS_DENIED;
-    case ENOENT:
-        return ERR_FILE_NOT_FOUND;
-    case EINVAL:
-        return ERR_DB_OPEN;
-    case ENOSPC:
-    case EDQUOT:
-        return ERR_NOT_ENOUGH_SPACE;
-    default:
-        return ERR_OPEN_FAILED;
-    }
-}
-
 unsigned SequenceFlag(int32_t cursor_type)
 {
     switch (cursor_type) {
@@ -88,84 +64,7 @@ unsigned SequenceFlag(int32_t cursor_type)
     }
 }
 
-// Removes a file that is not a store so that the next open can create one. Only root clears the names of the families.
-int RemoveForeign(const char *path, bool is_ours)
-{
-    if (is_ours && ::geteuid() != 0)
-        return ERR_ACCESS_DENIED;
-    if (is_ours)
-        FreeName(path);
-    else
-        ::unlink(path);
-    errno = EINVAL;
-    return ERR_DB_OPEN;
-}
-
-// Whether the database has opened the very file that was looked at.
-bool IsSameFile(const DB *db, const StoreFile &file)
-{
-    struct stat st;
-    return ::fstat(db->fd(db), &st) == 0 && st.st_dev == file.device && st.st_ino == file.inode;
-}
-
 }  // namespace
-
-int Btree::Open(const char *path, const Options &options, std::unique_ptr<Btree> &out)
-{
-    const Extras *extras = LoadExtras();
-    if (!extras)
-        return ERR_OPEN_FAILED;
-    const bool may_create = (options.flags & O_CREAT) != 0;
-    const mode_t mode_of_ours = ModeOfStore(path);
-    const StoreAccess access{mode_of_ours != 0 ? mode_of_ours : options.mode, mode_of_ours != 0};
-    if (access.is_ours && may_create && ::geteuid() != 0)
-        return ERR_ACCESS_DENIED;
-    struct stat st;
-    if (may_create && ::lstat(path, &st) == 0 && S_ISREG(st.st_mode) &&
-        (st.st_size == 0 || (options.flags & O_TRUNC) != 0))
-        ::unlink(path);  // an empty file is as good as none to a caller who would create one
-    StoreFile file;
-    BtreeFile found = LookAtBtreeFile(path, access, file);
-    if (found == BtreeFile::missing && may_create) {
-        if (!CreateBtreeFile(path, options.info, access.mode))
-            return OpenCode(errno);
-        found = LookAtBtreeFile(path, access, file);
-    }
-    switch (found) {
-    case BtreeFile::foreign:
-        return RemoveForeign(path, access.is_ours);
-    case BtreeFile::unreadable:
-        return OpenCode(errno);
-    case BtreeFile::missing:
-        return ERR_FILE_NOT_FOUND;
-    case BtreeFile::store:
-        break;
-    }
-    std::unique_ptr<Btree> store(new Btree(path, (options.flags & O_ACCMODE) == O_RDONLY));
-    errno = 0;
-    store->pDb = extras->open_btree(path, options.flags & O_ACCMODE, 0, options.info);
-    if (!store->pDb)
-        return errno == EINVAL ? RemoveForeign(path, access.is_ours) : OpenCode(errno);
-    if (!IsSameFile(Handle(store.get()), file))
-        return ERR_OPEN_FAILED;
-    out = std::move(store);
-    return 0;
-}
-
-int Btree::Create(const char *path, std::unique_ptr<Btree> &out)
-{
-    const Extras *extras = LoadExtras();
-    if (!extras)
-        return ERR_OPEN_FAILED;
-    const NoStoreSync no_sync;
-    std::unique_ptr<Btree> store(new Btree(path, false));
-    errno = 0;
-    store->pDb = extras->open_btree(path, O_RDWR | O_CREAT, 0600, true);
-    if (!store->pDb)
-        return OpenCode(errno);
-    out = std::move(store);
-    return 0;
-}
 
 Btree::~Btree()
 {
@@ -196,19 +95,25 @@ int Btree::Set(std::string_view key, std::string_view value)
     return 0;
 }
 
+int Btree::Damaged(int code)
+{
+    damaged_ = true;
+    return CodeOf(errno, code);
+}
+
 int Btree::Put(std::string_view key, std::string_view value)
 {
     DBT name = Item(key);
     const DBT content = Item(value);
     // Files of the first appliances had duplicate reserved keys; storing over one of them kept the other.
     if (key.starts_with('#') && Handle(this)->del(Handle(this), &name, 0) < 0)
-        return CodeOf(errno, ERR_DB_STORE);
+        return Damaged(ERR_DB_STORE);
     if (Handle(this)->put(Handle(this), &name, &content, 0) != 0)
-        return CodeOf(errno, ERR_DB_STORE);
+        return Damaged(ERR_DB_STORE);
     return 0;
 }
 
-int Btree::TakeOver(const std::map<std::string, std::string, std::less<>> &entries)
+int Btree::TakeOver(const std::map<std::string, std::string, std::less<>> &entries, StoreContents contents)
 {
     if (!NoteChange())
         return ERR_DB_STORE;
@@ -217,20 +122,24 @@ int Btree::TakeOver(const std::map<std::string, std::string, std::less<>> &entri
     std::string_view value;
     int code;
     for (Entry which = Entry::kFirst; (code = Walk(which, key, value)) == 0; which = Entry::kNext)
-        if (!entries.contains(key) && !touched_.contains(key) && key.find('\\') == key.npos &&
-            value.find('\\') == value.npos)
+        if (!entries.contains(key) && !touched_.contains(key) && !IsDomainEntry(key, value, contents))
             gone.emplace_back(key);
     if (code != ERR_DB_END)
         return code;
     for (const std::string &each : gone) {
         const DBT name = Item(each);
         if (Handle(this)->del(Handle(this), &name, 0) < 0)
-            return CodeOf(errno, ERR_DB_DELETE);
+            return Damaged(ERR_DB_DELETE);
     }
-    for (const auto &[each, text] : entries)
-        if (!touched_.contains(each) && (Get(each, value) != 0 || value != text))
-            if ((code = Put(each, text)) != 0)
-                return code;
+    for (const auto &[each, text] : entries) {
+        if (touched_.contains(each))
+            continue;
+        code = Get(each, value);
+        if (code == ERR_KEY_NOT_FOUND || (code == 0 && value != text))
+            code = Put(each, text);
+        if (code != 0)
+            return code;
+    }
     return 0;
 }
 
@@ -241,7 +150,7 @@ int Btree::Delete(std::string_view key)
     const DBT name = Item(key);
     const int result = Handle(this)->del(Handle(this), &name, 0);
     if (result != 0)
-        return result > 0 ? ERR_KEY_NOT_FOUND : CodeOf(errno, ERR_DB_DELETE);
+        return result > 0 ? ERR_KEY_NOT_FOUND : Damaged(ERR_DB_DELETE);
     deleted_.emplace(key);
     touched_.emplace(key);
     return 0;
@@ -293,14 +202,14 @@ int Btree::SetNumber(std::string_view key, int32_t value)
 int Btree::Flush()
 {
     const NoStoreSync no_sync;
-    return Handle(this)->sync(Handle(this), 0) == 0 ? 0 : CodeOf(errno, ERR_DB_STORE);
+    return Handle(this)->sync(Handle(this), 0) == 0 ? 0 : Damaged(ERR_DB_STORE);
 }
 
 int Btree::Close()
 {
     if (const int code = CloseFile())
         return code;
-    if (std::exchange(sealed_, false))
+    if (std::exchange(sealed_, false) && !damaged_)
         WriteSeal(*FamilyOfStore(path_.c_str()), texts_);
     return 0;
 }
@@ -310,8 +219,9 @@ int Btree::CloseFile() noexcept
     if (!pDb)
         return 0;
     const NoStoreSync no_sync;
-    DB *db = static_cast<DB *>(std::exchange(pDb, nullptr));
-    return db->close(db) == 0 ? 0 : ERR_DB_CLOSE;
+    if (LoadExtras()->close_btree(std::exchange(pDb, nullptr)) == 0)
+        return 0;
+    return errno == ENOMEM ? ERR_OUT_OF_MEMORY : ERR_DB_CLOSE;
 }
 
 // A change through a handle of a caller's own, not by the account families (they break the seal first and make it anew
@@ -328,7 +238,7 @@ bool Btree::NoteChange()
     if (family)
         texts_ = StampTexts(*family);
     sealed_ = family && SealHolds(*family);
-    if (sealed_)
+    if (sealed_ && !damaged_)
         BreakSeal(*family);
     return true;
 }

@@ -3,6 +3,7 @@
 #ifndef TAVO_ACCOUNT_DETAIL_BTREE_H
 #define TAVO_ACCOUNT_DETAIL_BTREE_H
 
+#include "account/detail/account_name.h"
 #include "account/detail/store_view.h"
 #include "tavo_bdb.h"
 
@@ -51,11 +52,12 @@ class Btree : public TAVOBDB, public StoreView {
     int GetNumber(std::string_view key, int32_t &value) const;
     int SetNumber(std::string_view key, int32_t value);
 
-    // Takes over what the text files say by now, except for the keys that were stored or deleted through this handle.
-    int TakeOver(const std::map<std::string, std::string, std::less<>> &entries);
+    // Takes over what the text files say by now, except for the keys that were stored or deleted through this handle, and
+    // for domain accounts, which the text files do not have.
+    int TakeOver(const std::map<std::string, std::string, std::less<>> &entries, StoreContents contents);
 
     int Flush();  // hands all pages to the file
-    int Close();  // Flush and release; ERR_DB_CLOSE
+    int Close();  // Flush and release; ERR_DB_CLOSE or ERR_OUT_OF_MEMORY
 
     // The keys that were deleted through this handle and not stored again.
     const std::set<std::string, std::less<>> &Deleted() const { return deleted_; }
@@ -66,6 +68,7 @@ class Btree : public TAVOBDB, public StoreView {
     }
     bool NoteChange();  // false when nothing may be changed
     int Put(std::string_view key, std::string_view value);
+    int Damaged(int code);
 
     int CloseFile() noexcept;
 
@@ -74,8 +77,9 @@ class Btree : public TAVOBDB, public StoreView {
     std::set<std::string, std::less<>> touched_;
     bool read_only_;
     bool changed_ = false;
-    bool sealed_ = false;  // before our first change, the seal beside the store held for this file
-    std::string texts_;    // what the text files looked like then
+    bool damaged_ = false;  // by a change that failed, perhaps halfway
+    bool sealed_ = false;   // before our first change, the seal beside the store held for this file
+    std::string texts_;     // what the text files looked like then
 };
 
 // The stored bytes of the reserved keys.

@@ -112,11 +112,11 @@ bool CreateBtreeFile(const char *path, bool info, mode_t mode)
     if (!extras)
         return false;
     const NoStoreSync no_sync;
-    DB *db = static_cast<DB *>(extras->open_btree(dir.File(), O_RDWR | O_CREAT, 0600, info));
-    if (!db)
+    void *store = extras->open_btree(dir.File(), O_RDWR | O_CREAT, 0600, info);
+    if (!store)
         return false;
     const Fd fd = OpenFd(dir.File(), O_RDONLY | O_NOFOLLOW);
-    if (db->close(db) != 0 || !fd)
+    if (extras->close_btree(store) != 0 || !fd)
         return false;
     if (mode != 0 && ::fchmod(fd.Get(), mode) != 0)
         return false;

@@ -6,6 +6,7 @@
 #include "core/detail/text_fields.h"
 #include "tavo_error.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cinttypes>
 
@@ -96,6 +97,25 @@ std::string FileIdentity(const char *path)
     std::snprintf(text, sizeof text, "%" PRIuMAX ":%" PRIdMAX ":%" PRIdMAX ".%09ld", uintmax_t{st.st_ino},
                   intmax_t{st.st_size}, intmax_t{st.st_mtim.tv_sec}, long{st.st_mtim.tv_nsec});
     return text;
+}
+
+bool Marker::HasMoreThanFiles() const
+{
+    return !homes.empty() || !stages.empty() ||
+           std::any_of(names.begin(), names.end(), [](const NameStep &name) { return name.pending != 0; });
+}
+
+void Marker::MakePending(unsigned target) noexcept
+{
+    for (NameStep &name : names)
+        name.pending |= name.targets & target;
+}
+
+void Marker::DropDone()
+{
+    std::erase_if(names, [](const NameStep &name) { return name.pending == 0; });
+    for (NameStep &name : names)
+        name.targets = name.pending;
 }
 
 std::string FormatMarker(const Marker &marker)

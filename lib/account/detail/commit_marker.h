@@ -68,6 +68,13 @@ struct Marker {
     std::vector<std::string> stages;
 
     bool IsEmpty() const { return files.empty() && names.empty() && homes.empty() && stages.empty(); }
+    bool HasMoreThanFiles() const;  // folders, or names that no file line is about
+
+    // A target's new file could not be put in place: its names are changed in what the file says by then.
+    void MakePending(unsigned target) noexcept;
+
+    // Keeps only the names that are pending.
+    void DropDone();
 };
 
 std::string FormatMarker(const Marker &marker);

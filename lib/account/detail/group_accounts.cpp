@@ -31,7 +31,7 @@ int TakeMembers(const TAVOGROUP &group, GroupChange &change)
 int FindOld(const TAVOGROUPDB &db, const char *old_name, GroupChange &change)
 {
     const std::optional<std::string> key = AccountKey(old_name, kGroupKeySize);
-    if (!key)
+    if (!key || IsDomainName(old_name))  // a domain's group lives there
         return ERR_NO_SUCH_GROUP;
     GroupLine old;
     if (const int code = ReadGroupLine(db, *key, old))
@@ -88,9 +88,9 @@ int PrepareGroup(const TAVOGROUPDB &db, const char *old_name, const TAVOGROUP &g
     if (old_name)
         if (const int code = FindOld(db, old_name, change))
             return code;
-    std::string_view taken;
-    if (change.old_key != change.key && Btree::Of(db.pName)->Get(change.key, taken) == 0)
-        return ERR_GROUP_EXISTS;
+    if (change.old_key != change.key)
+        if (const int code = RequireAbsent(*Btree::Of(db.pName), change.key, ERR_GROUP_EXISTS))
+            return code;
     if (!IsAccountName(group.szName, kGroupNameChars) || IsDotName(group.szName))
         return ERR_INVALID_GROUPNAME;
     change.line.name = group.szName;
@@ -103,19 +103,27 @@ int PrepareGroup(const TAVOGROUPDB &db, const char *old_name, const TAVOGROUP &g
 int StoreGroup(const TAVOGROUPDB &db, const GroupChange &change)
 {
     std::string description;
-    std::string_view line;
     if (!change.old_key.empty()) {
-        if (Btree::Of(db.pDesc)->Get(change.old_key, line) == 0)
+        std::string_view line;
+        int code = Btree::Of(db.pDesc)->Get(change.old_key, line);
+        if (code == 0)
             description = GroupDescription(line);
+        else if (code != ERR_KEY_NOT_FOUND)
+            return code;
         // The entries of a group that keeps its key are overwritten anyway.
         const bool overwritten = change.old_key == change.key && !IsEverybody(change.key);
-        if (const int code = RemoveGroup(db, change.old_key, change.old_gid); code != 0 && !overwritten)
+        code = RemoveGroup(db, change.old_key, change.old_gid);
+        if (code != 0 && !overwritten)
             return code;
     }
     int code = Btree::Of(db.pName)->Set(change.key, WithNul(FormatGroupLine(change.line)));
-    std::string_view other;
-    if (code == 0 && Btree::Of(db.pGid)->Get(IdKey(change.line.gid), other) != 0)
+    // Of two groups with one id the first keeps the index.
+    if (code == 0)
+        code = RequireAbsent(*Btree::Of(db.pGid), IdKey(change.line.gid), ERR_KEY_EXISTS);
+    if (code == 0)
         code = Btree::Of(db.pGid)->Set(IdKey(change.line.gid), change.key);
+    if (code == ERR_KEY_EXISTS)
+        code = 0;
     if (code == 0 && !description.empty())
         code = Btree::Of(db.pDesc)->Set(change.key, WithNul(FormatGroupDescLine(change.line.name, description)));
     return code;
@@ -128,7 +136,7 @@ int RemoveGroup(const TAVOGROUPDB &db, const std::string &key, int32_t gid)
                          indexed ? Btree::Of(db.pGid)->Delete(IdKey(gid)) : 0};
     for (const int code : codes)
         if (code != 0 && code != ERR_KEY_NOT_FOUND)
-            return ERR_GROUP_DB_DELETE;
+            return code == ERR_OUT_OF_MEMORY ? code : int{ERR_GROUP_DB_DELETE};
     return 0;
 }
 

@@ -40,7 +40,7 @@ int PrepareGroup(const TAVOGROUPDB &db, const char *old_name, const TAVOGROUP &g
 // Fails only when a store cannot be changed; then the stores are no longer to be trusted.
 int StoreGroup(const TAVOGROUPDB &db, const GroupChange &change);
 
-// ERR_GROUP_DB_DELETE when a store cannot be changed. What is not there needs no deleting.
+// ERR_GROUP_DB_DELETE or ERR_OUT_OF_MEMORY when a store cannot be changed. What is not there needs no deleting.
 int RemoveGroup(const TAVOGROUPDB &db, const std::string &key, int32_t gid);
 
 }  // namespace tavo

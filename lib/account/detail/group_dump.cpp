@@ -6,6 +6,7 @@
 #include "account/detail/family_dump.h"
 #include "account/detail/group_accounts.h"
 #include "account/detail/group_line.h"
+#include "account/detail/id_index.h"
 #include "account/detail/indexed_accounts.h"
 #include "account/detail/misc_line.h"
 #include "core/detail/log.h"
@@ -32,12 +33,13 @@ int ComposeFiles(const TAVOGROUPDB &db, GroupDumpReport &report, std::string (&t
     std::vector<IndexedAccount> groups;
     if (const int code = CollectAccounts(*Btree::Of(db.pGid), *Btree::Of(db.pName), kGroupLines, keys, groups))
         return code;
-    report.lost = AccountThatWouldBeLost(*Btree::Of(db.pName), kGroupLines, keys);
-    if (!report.lost.empty())
+    report.groups = ReviewFile(*Btree::Of(db.pName), kGroupLines, keys);
+    if (!report.groups.lost.empty())
         return ERR_WRITE_FAILED;
-    int32_t current = TAVO_GROUP_GID_MIN - 1;
-    Btree::Of(db.pGid)->GetNumber(kCurrentGidKey, current);
-    texts[kGroupText] = FormatMarkerLine(kGidMarker, current);
+    int32_t last_gid = TAVO_GROUP_GID_MIN - 1;
+    if (const int code = ReadLastId(*Btree::Of(db.pGid), kCurrentGidKey, last_gid))
+        return code;
+    texts[kGroupText] = FormatMarkerLine(kGidMarker, last_gid);
     for (const IndexedAccount &group : groups) {
         texts[kGroupText].append(group.line) += '\n';
         std::string_view description;
@@ -64,6 +66,12 @@ int ComposeGroups(const TAVOGROUPDB &db, AccountCommit &commit, unsigned target,
     return WriteFamily(kGroupFamily, stores, texts, commit, target, report.not_opened);
 }
 
+void LogDroppedGroups(const GroupDumpReport &report, Where where)
+{
+    for (const std::string &line : report.groups.dropped)
+        LogErrorAt(where, "%s:%d Line [%s] of %s is not a group and is not written again", line, kGroupLines.path);
+}
+
 int CommitGroups(AccountTransaction &change, Where where)
 {
     GroupDumpReport report;
@@ -74,12 +82,14 @@ int CommitGroups(AccountTransaction &change, Where where)
     });
     if (code == 0)
         code = change.Commit();
-    if (code == 0)
+    if (code == 0) {
+        LogDroppedGroups(report, where);
         return 0;
+    }
     if (report.not_opened)
         LogErrorAt(where, "%s:%d fail to open file[%s]", report.not_opened);
-    else if (!report.lost.empty())
-        LogErrorAt(where, "%s:%d Group [%s] would be lost, the files are left alone", report.lost);
+    else if (!report.groups.lost.empty())
+        LogErrorAt(where, "%s:%d Group [%s] would be lost, the files are left alone", report.groups.lost);
     else
         LogErrorAt(where, "%s:%d Failed to write the group files, tavoerr=0x%04X, errno=%d", code, errno);
     return code;

@@ -42,7 +42,7 @@ int ListGroups(int flags, const KeyFilter &wanted, std::vector<std::string> &nam
         if ((flags & kind) != 0 && IsListed(group, flags) && wanted(key.substr(0, key.find('\0'))))
             names.push_back(group.name);
     }
-    return code == ERR_DB_END ? 0 : int{ERR_ENUM_FAILED};
+    return code == ERR_DB_END ? 0 : code == ERR_OUT_OF_MEMORY ? code : int{ERR_ENUM_FAILED};
 }
 
 std::optional<std::string> GroupFilterText(const char *text)

@@ -42,11 +42,15 @@ int FindKeyById(const StoreView &index, StoreView &names, int32_t id, bool (*has
 {
     std::string_view owner;
     std::string_view line;
-    if (index.Get(IdKey(id), owner) == 0 && names.Get(owner, line) == 0 && has_id(line, id)) {
+    int code = index.Get(IdKey(id), owner);
+    if (code == 0)
+        code = names.Get(owner, line);
+    if (code == 0 && has_id(line, id)) {
         key = owner;
         return 0;
     }
-    int code;
+    if (code != 0 && code != ERR_KEY_NOT_FOUND)
+        return code;
     for (Entry which = Entry::kFirst; (code = names.Walk(which, owner, line)) == 0; which = Entry::kNext) {
         if (has_id(line, id)) {
             key = owner;
@@ -56,6 +60,16 @@ int FindKeyById(const StoreView &index, StoreView &names, int32_t id, bool (*has
     return code == ERR_DB_END ? int{ERR_KEY_NOT_FOUND} : code;
 }
 
+int ReadLastId(const Btree &index, std::string_view current_key, int32_t &id)
+{
+    int32_t last = 0;
+    const int code = index.GetNumber(current_key, last);
+    if (code == 0)
+        id = last;
+    // One of another size is as good as none.
+    return code == ERR_KEY_NOT_FOUND || code == ERR_DB_CURSOR ? 0 : code;
+}
+
 int FindFreeId(Btree &index, const IdRange &range, int32_t &id)
 {
     int32_t current = 0;
@@ -63,15 +77,15 @@ int FindFreeId(Btree &index, const IdRange &range, int32_t &id)
     if (code == ERR_KEY_NOT_FOUND)
         code = LastId(index, current);
     if (code != 0)
-        return ERR_DB_CURSOR;
+        return code == ERR_OUT_OF_MEMORY ? code : int{ERR_DB_CURSOR};
     const int32_t begin = current < range.first || current >= range.last ? range.first : current + 1;
     int32_t candidate = begin;
     do {
-        std::string_view owner;
-        if (index.Get(IdKey(candidate), owner) != 0) {
+        code = RequireAbsent(index, IdKey(candidate), ERR_KEY_EXISTS);
+        if (code == 0)
             id = candidate;
-            return 0;
-        }
+        if (code != ERR_KEY_EXISTS)
+            return code;
         candidate = candidate == range.last ? range.first : candidate + 1;
     } while (candidate != begin);
     return range.full;

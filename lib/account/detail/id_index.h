@@ -24,7 +24,10 @@ struct IdRange {
     int full;  // the code when every id is taken
 };
 
-// The next free id behind the one handed out last, round the end of the range. 0, ERR_DB_CURSOR or range.full.
+// The id handed out last, for the first line of a text file. Without a record of it `id` stays. 0 or a code of the store.
+int ReadLastId(const Btree &index, std::string_view current_key, int32_t &id);
+
+// The next free id behind the one handed out last, round the end of the range. 0, ERR_DB_CURSOR, ERR_OUT_OF_MEMORY or range.full.
 int FindFreeId(Btree &index, const IdRange &range, int32_t &id);
 
 }  // namespace tavo

@@ -10,6 +10,8 @@
 namespace tavo {
 namespace {
 
+constexpr size_t kLongestBeginning = 64;
+
 int AddAccount(std::string_view key, std::string_view value, const AccountLines &lines, AccountKeys &seen,
                std::vector<IndexedAccount> &accounts)
 {
@@ -44,7 +46,10 @@ int CollectAccounts(Btree &index, Btree &names, const AccountLines &lines, Accou
     int code;
     for (Entry which = Entry::kFirst; (code = index.Walk(which, key, value)) == 0; which = Entry::kNext) {
         std::string_view line;
-        if (names.Get(value, line) == 0 && (code = AddAccount(value, line, lines, keys, accounts)) != 0)
+        code = names.Get(value, line);
+        if (code == 0)
+            code = AddAccount(value, line, lines, keys, accounts);
+        if (code != 0 && code != ERR_KEY_NOT_FOUND)
             return code;
     }
     if (code != ERR_DB_END)
@@ -57,24 +62,35 @@ int CollectAccounts(Btree &index, Btree &names, const AccountLines &lines, Accou
     return code == ERR_DB_END ? 0 : code;
 }
 
-std::string AccountThatWouldBeLost(const Btree &names, const AccountLines &lines, const AccountKeys &kept)
+FileReview ReviewFile(const Btree &names, const AccountLines &lines, const AccountKeys &kept)
 {
+    FileReview review;
     std::string text;
     int64_t ignored = 0;
-    if (!ReadTextFile(lines.path, text, ignored))
-        return "?";
+    if (!ReadTextFile(lines.path, text, ignored)) {
+        review.lost = "?";
+        return review;
+    }
+    std::set<std::string, std::less<>> seen;
     for (std::string_view rest = text; !rest.empty();) {
         std::string name;
         int32_t id = -1;
         const std::string_view whole = TakeLine(rest);
-        if (whole.find('\0') != whole.npos || lines.parse(whole, name, id) != 0 || IsDomainName(name))
+        const bool is_account =
+            whole.find('\0') == whole.npos && lines.parse(whole, name, id) == 0 && !IsDomainName(name);
+        if (!is_account || !seen.insert(name).second) {
+            // Comments mean nothing to the system. A line may hold a hash, so the log has only its first field.
+            if (!whole.empty() && !whole.starts_with('#'))
+                review.dropped.emplace_back(whole.substr(0, std::min(whole.find(':'), kLongestBeginning)));
             continue;
+        }
         const std::string as_it_stands = name + '\0';
         const std::string key = AccountKey(name, lines.key_size).value_or(as_it_stands);
-        if (!kept.contains(key) && !kept.contains(as_it_stands) && !names.Deleted().contains(key))
-            return name;
+        if (review.lost.empty() && !kept.contains(key) && !kept.contains(as_it_stands) &&
+            !names.Deleted().contains(key))
+            review.lost = name;
     }
-    return {};
+    return review;
 }
 
 }  // namespace tavo

@@ -35,9 +35,13 @@ bool IsOneLine(std::string_view line);
 int CollectAccounts(Btree &index, Btree &names, const AccountLines &lines, AccountKeys &keys,
                     std::vector<IndexedAccount> &accounts);
 
-// The files are written whole, so an account that the stores do not know would be gone without anybody having deleted
-// it. Its name; empty when there is none.
-std::string AccountThatWouldBeLost(const Btree &names, const AccountLines &lines, const AccountKeys &kept);
+// What becomes of the lines of a text file that is written whole from the stores.
+struct FileReview {
+    std::string lost;  // an account that would be gone without anybody having deleted it; empty for none
+    std::vector<std::string> dropped;  // how lines begin that are not accounts and are not written again
+};
+
+FileReview ReviewFile(const Btree &names, const AccountLines &lines, const AccountKeys &kept);
 
 }  // namespace tavo
 

@@ -54,9 +54,11 @@ std::string HashSetting(std::string_view previous, time_t now)
 
 HashMethod ConfiguredHashMethod()
 {
-    if (SettingEquals(kFactorySettings, "password_hash", "sha512"))
-        return HashMethod::kSha512;
-    return SettingEquals(kFactorySettings, "password_hash", "yescrypt") ? HashMethod::kYescrypt : HashMethod::kMd5;
+    const std::optional<bool> sha512 = ReadSetting(kFactorySettings, "password_hash", "sha512");
+    const std::optional<bool> yescrypt = ReadSetting(kFactorySettings, "password_hash", "yescrypt");
+    if (!sha512 || !yescrypt)
+        return HashMethod::kUnknown;
+    return *sha512 ? HashMethod::kSha512 : *yescrypt ? HashMethod::kYescrypt : HashMethod::kMd5;
 }
 
 std::string HashPassword(const char *clear, std::string_view previous, time_t now, HashMethod method)

@@ -14,8 +14,8 @@ namespace tavo {
 std::string HashSetting(std::string_view previous, time_t now);
 
 // The methods that "password_hash" in /etc.defaults/tavoinfo.conf names. MD5-crypt is what the appliance's other programs
-// expect, and what an absent or unknown value means.
-enum class HashMethod { kMd5, kSha512, kYescrypt };
+// expect, and what an absent or unknown value means. kUnknown: the setting cannot be read.
+enum class HashMethod { kMd5, kSha512, kYescrypt, kUnknown };
 
 HashMethod ConfiguredHashMethod();
 

@@ -1,8 +1,9 @@
 // Builds the stores of a family anew from its text files.
 #include "account/detail/store_build.h"
 
-#include "account/detail/account_commit.h"
 #include "account/detail/btree.h"
+#include "account/detail/commit_resume.h"
+#include "account/detail/domain_part.h"
 #include "account/detail/free_name.h"
 #include "account/detail/store_seal.h"
 #include "core/detail/owner.h"
@@ -139,6 +140,7 @@ bool ReadContent(const AccountKind &kind, StoreContent &out)
 int BuildStores(const AccountKind &kind, std::string &texts)
 {
     const StoreFamily &family = kind.family;
+    std::vector<StoreEntries> domain = ReadDomainPart(kind);
     BreakSeal(family);
     if (const int code = FinishAccountFiles())
         return code;
@@ -146,6 +148,8 @@ int BuildStores(const AccountKind &kind, std::string &texts)
     StoreContent content;
     if (!ReadContent(kind, content))
         return ERR_READ_FAILED;
+    for (size_t i = 0; i < domain.size(); ++i)
+        content.stores[i].merge(domain[i]);  // what the text files have wins
     RemoveLeftFolders(family);
     const BuildFolder folder(family);
     if (!folder)
@@ -158,7 +162,7 @@ int BuildStores(const AccountKind &kind, std::string &texts)
             code = ERR_OPEN_FAILED;
     if (code == 0)
         WriteSeal(family, texts);
-    return code == ERR_NOT_ENOUGH_SPACE || code == ERR_OUT_OF_MEMORY ? code : code == 0 ? 0 : int{ERR_OPEN_FAILED};
+    return code == 0 ? 0 : CodeOfStores(code);
 }
 
 }  // namespace tavo

@@ -2,8 +2,10 @@
 #ifndef TAVO_ACCOUNT_DETAIL_STORE_BUILD_H
 #define TAVO_ACCOUNT_DETAIL_STORE_BUILD_H
 
+#include "account/detail/account_name.h"
 #include "account/detail/store_content.h"
 #include "account/detail/store_family.h"
+#include "tavo_error.h"
 
 namespace tavo {
 
@@ -17,11 +19,23 @@ struct AccountKind {
     std::vector<StoreEntries> (*entries)(std::span<const std::string> texts);  // what the text files make of the stores
 };
 
+inline StoreContents ContentsOf(const AccountKind &kind, size_t store)
+{
+    return store == kind.id_store ? StoreContents::kIndex : StoreContents::kLines;
+}
+
+// What a caller learns of stores that cannot be opened or built: want of memory or space, else ERR_OPEN_FAILED.
+inline int CodeOfStores(int code)
+{
+    return code == ERR_NOT_ENOUGH_SPACE || code == ERR_OUT_OF_MEMORY ? code : int{ERR_OPEN_FAILED};
+}
+
 // What the text files make of the stores. False when one is there but cannot be read.
 bool ReadContent(const AccountKind &kind, StoreContent &out);
 
 // Completes a half-done commit, reads the text files and puts new stores in place of the old ones, whatever those are;
-// old ones that were root's and hold no secrets are kept as "NAME.bak". The locks must be held exclusively.
+// old ones that were root's and hold no secrets are kept as "NAME.bak". Fresh
+// entries of domain accounts stay. The locks must be held exclusively.
 // `texts` becomes what the text files looked like when they were read.
 // 0, ERR_OPEN_FAILED, ERR_READ_FAILED, ERR_NOT_ENOUGH_SPACE, ERR_OUT_OF_MEMORY or ERR_RENAME_FAILED.
 int BuildStores(const AccountKind &kind, std::string &texts);

@@ -50,26 +50,46 @@ bool AddLine(std::string &text, const char *path, bool may_be_missing)
     return true;
 }
 
-// What a seal that holds says; empty when the stores are incomplete.
-std::string SealText(const StoreFamily &family, const std::string &texts)
+// What a seal says of the stores; empty when they are incomplete.
+std::string StoresText(const StoreFamily &family)
 {
     std::string text = RunOfTheMachine();
     for (const StoreRow &store : family.stores)
         if (!AddLine(text, store.path, false))
             return {};
-    return texts.empty() ? std::string() : text + texts;
+    return text;
+}
+
+// What a seal that holds says; empty when there can be none.
+std::string SealText(const StoreFamily &family, const std::string &texts)
+{
+    const std::string stores = StoresText(family);
+    return stores.empty() || texts.empty() ? std::string() : stores + texts;
+}
+
+// Empty when there is none that root alone can have written.
+std::string ReadSeal(const StoreFamily &family)
+{
+    const Fd fd = OpenFd(family.seal, O_RDONLY | O_NOFOLLOW);
+    struct stat st;
+    if (!fd || ::fstat(fd.Get(), &st) != 0 || !S_ISREG(st.st_mode) || (st.st_mode & 022) != 0 || st.st_uid != 0)
+        return {};
+    return ReadSmall(fd);
 }
 
 }  // namespace
 
 bool SealHolds(const StoreFamily &family)
 {
-    const Fd fd = OpenFd(family.seal, O_RDONLY | O_NOFOLLOW);
-    struct stat st;
-    if (!fd || ::fstat(fd.Get(), &st) != 0 || !S_ISREG(st.st_mode) || (st.st_mode & 022) != 0 || st.st_uid != 0)
-        return false;
-    const std::string sealed = ReadSmall(fd);
+    const std::string sealed = ReadSeal(family);
     return !sealed.empty() && sealed == SealText(family, StampTexts(family));
+}
+
+bool StoresAreWhole(const StoreFamily &family)
+{
+    const std::string sealed = ReadSeal(family);
+    const std::string stores = StoresText(family);
+    return !stores.empty() && sealed.starts_with(stores);
 }
 
 void BreakSeal(const StoreFamily &family) noexcept

@@ -14,6 +14,9 @@ namespace tavo {
 // True when every store and text file is the very file, unchanged, that the seal knows, in this run of the machine.
 bool SealHolds(const StoreFamily &family);
 
+// True when the stores at least are the very files that were sealed. They may differ from the text files by now.
+bool StoresAreWhole(const StoreFamily &family);
+
 void BreakSeal(const StoreFamily &family) noexcept;
 
 // What the text files look like: to be taken before they are read. Empty, for which no seal is written, when one of them is

@@ -3,6 +3,8 @@
 #ifndef TAVO_ACCOUNT_DETAIL_STORE_VIEW_H
 #define TAVO_ACCOUNT_DETAIL_STORE_VIEW_H
 
+#include "tavo_error.h"
+
 #include <string_view>
 
 namespace tavo {
@@ -22,6 +24,24 @@ class StoreView {
     // The entries in the order of their keys, without the reserved ones. Past the end: ERR_DB_END.
     virtual int Walk(Entry which, std::string_view &key, std::string_view &value) = 0;
 };
+
+// A store that cannot be read says nothing about what is in it: 0 when the key is absent, `present` when it is there, else
+// the code of the failure.
+inline int RequireAbsent(const StoreView &store, std::string_view key, int present)
+{
+    std::string_view value;
+    const int code = store.Get(key, value);
+    return code == 0 ? present : code == ERR_KEY_NOT_FOUND ? 0 : code;
+}
+
+// An absent line leaves the record as it is.
+template <class Line>
+int ReadOptional(const StoreView &store, std::string_view key, int (*parse)(std::string_view, Line &), Line &line)
+{
+    std::string_view value;
+    const int code = store.Get(key, value);
+    return code == 0 ? parse(value, line) : code == ERR_KEY_NOT_FOUND ? 0 : code;
+}
 
 }  // namespace tavo
 

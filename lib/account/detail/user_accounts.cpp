@@ -13,17 +13,10 @@ namespace {
 
 constexpr std::string_view kLocked = "*";  // the hash of an account without a shadow line: nobody logs in with it
 
-// An absent line leaves the record as it is.
-template <class Line>
-int ReadOptional(const StoreView &store, std::string_view key, int (*parse)(std::string_view, Line &), Line &line)
-{
-    std::string_view value;
-    const int code = store.Get(key, value);
-    return code == 0 ? parse(value, line) : code == ERR_KEY_NOT_FOUND ? 0 : code;
-}
-
 int Privilege(std::string_view key, const MiscLine &misc)
 {
+    if (IsDomainName(key))
+        return TAVO_USER_PRIVILEGE_DOMAIN;
     return key == WithNul("ADMIN") ? int{TAVO_USER_PRIVILEGE_ADMIN} : misc.privilege;
 }
 
@@ -112,9 +105,11 @@ int StoreUser(const TAVOUSERDB &db, const UserChange &change)
         if (!change.old_key.empty() && HasIndex(*Btree::Of(db.pUid), change.old_uid, change.old_key) &&
             (code = DeleteEntry(db.pUid, IdKey(change.old_uid))) != 0)
             return code;
-        std::string_view other;
-        if (Btree::Of(db.pUid)->Get(IdKey(change.uid), other) != 0 &&
-            (code = Btree::Of(db.pUid)->Set(IdKey(change.uid), change.key)) != 0)
+        // Of two accounts with one id the first keeps the index.
+        code = RequireAbsent(*Btree::Of(db.pUid), IdKey(change.uid), ERR_KEY_EXISTS);
+        if (code == 0)
+            code = Btree::Of(db.pUid)->Set(IdKey(change.uid), change.key);
+        if (code != 0 && code != ERR_KEY_EXISTS)
             return code;
     }
     const struct {

@@ -51,12 +51,9 @@ int ReadOld(const TAVOUSERDB &db, std::string_view key, OldUser &old)
         return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
     old.shadow.hash = "*";
     old.smb.lm_hash = old.smb.nt_hash = kNoSmbHash;
-    std::string_view value;
-    if (Btree::Of(db.pShadow)->Get(key, value) == 0 && (code = ParseShadowLine(value, old.shadow)) != 0)
+    if ((code = ReadOptional(*Btree::Of(db.pShadow), key, ParseShadowLine, old.shadow)) != 0)
         return code;
-    if (Btree::Of(db.pSmb)->Get(key, value) == 0 && (code = ParseSmbpasswdLine(value, old.smb)) != 0)
-        return code;
-    return 0;
+    return ReadOptional(*Btree::Of(db.pSmb), key, ParseSmbpasswdLine, old.smb);
 }
 
 // A password that is the stored hash stays, with its Samba hashes; any other is clear text.
@@ -69,6 +66,8 @@ int ChoosePassword(const char *password, const OldUser *old, const Hashing &hash
         smb.nt_hash = old->smb.nt_hash;
         return 0;
     }
+    if (hashing.method == HashMethod::kUnknown)
+        return ERR_READ_FAILED;
     hash = HashPassword(password, old ? std::string_view(old->shadow.hash) : std::string_view(), hashing.now,
                         hashing.method);
     if (hash.empty())
@@ -87,7 +86,7 @@ int ChoosePassword(const char *password, const OldUser *old, const Hashing &hash
 int FindOld(const TAVOUSERDB &db, const char *old_name, UserChange &change, OldUser &old)
 {
     const std::optional<std::string> key = AccountKey(old_name);
-    if (!key)
+    if (!key || IsDomainName(old_name))  // a domain's account lives there
         return ERR_NO_SUCH_USER;
     if (const int code = ReadOld(db, *key, old))
         return code;
@@ -117,9 +116,9 @@ int PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user
     if (old_name)
         if (const int code = FindOld(db, old_name, change, old))
             return code;
-    std::string_view taken;
-    if (change.old_key != change.key && Btree::Of(db.pName)->Get(change.key, taken) == 0)
-        return ERR_USER_EXISTS;
+    if (change.old_key != change.key)
+        if (const int code = RequireAbsent(*Btree::Of(db.pName), change.key, ERR_USER_EXISTS))
+            return code;
 
     const std::string name = user.szName;
     change.uid = old_name && (user.nUid < 0 || change.keep_index) ? old.passwd.uid : user.nUid;

@@ -3,6 +3,7 @@
 
 #include "account/detail/account_name.h"
 #include "account/detail/family_dump.h"
+#include "account/detail/id_index.h"
 #include "account/detail/indexed_accounts.h"
 #include "account/detail/misc_line.h"
 #include "account/detail/passwd_line.h"
@@ -42,23 +43,19 @@ int WriteLines(TAVOBDB *store, const std::vector<IndexedAccount> &accounts, cons
     return 0;
 }
 
-int32_t CurrentUid(const TAVOUSERDB &db)
-{
-    int32_t uid = TAVO_USER_UID_MIN - 1;
-    Btree::Of(db.pUid)->GetNumber(kCurrentUidKey, uid);
-    return uid;
-}
-
 int ComposeFiles(const TAVOUSERDB &db, DumpReport &report, std::string (&texts)[kUserTexts])
 {
     AccountKeys keys;
     std::vector<IndexedAccount> accounts;
     if (const int code = CollectAccounts(*Btree::Of(db.pUid), *Btree::Of(db.pName), kAccountLines, keys, accounts))
         return code;
-    report.lost = AccountThatWouldBeLost(*Btree::Of(db.pName), kAccountLines, keys);
-    if (!report.lost.empty())
+    report.passwd = ReviewFile(*Btree::Of(db.pName), kAccountLines, keys);
+    if (!report.passwd.lost.empty())
         return ERR_WRITE_FAILED;
-    texts[kMiscText] = FormatMarkerLine(kUidMarker, CurrentUid(db)) + kMiscComment;
+    int32_t last_uid = TAVO_USER_UID_MIN - 1;
+    if (const int code = ReadLastId(*Btree::Of(db.pUid), kCurrentUidKey, last_uid))
+        return code;
+    texts[kMiscText] = FormatMarkerLine(kUidMarker, last_uid) + kMiscComment;
     for (const IndexedAccount &account : accounts)
         texts[kPasswdText].append(account.line) += '\n';
     const struct {

@@ -3,6 +3,7 @@
 #define TAVO_ACCOUNT_DETAIL_USER_DUMP_H
 
 #include "account/detail/account_commit.h"
+#include "account/detail/indexed_accounts.h"
 #include "tavo_user.h"
 
 #include <string>
@@ -20,7 +21,7 @@ struct DumpReport {
     };
     std::vector<Missing> missing;
     const char *not_opened = nullptr;  // the temporary file of ERR_OPEN_FAILED
-    std::string lost;                  // the account that would have been lost
+    FileReview passwd;                 // what becomes of the lines of /etc/passwd
 };
 
 // Adds the files to a commit. 0, ERR_OPEN_FAILED, ERR_WRITE_FAILED, ERR_NOT_ENOUGH_SPACE, ERR_FORMAT_ERROR (a store holds a

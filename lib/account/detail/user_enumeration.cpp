@@ -62,7 +62,9 @@ int ListUsers(int flags, const KeyFilter &wanted, std::vector<std::string> &name
     AccountSession session(kUserKind);
     if (const int code = session.OpenToRead(std::array{size_t{kNameStore}}))
         return code;
-    const bool guest_is_supported = SettingIsYes(kFactorySettings, "supportguest");
+    const std::optional<bool> guest_is_supported = ReadSetting(kFactorySettings, "supportguest", "yes");
+    if (!guest_is_supported)
+        return ERR_ENUM_FAILED;
     StoreView &accounts = *session.View(kNameStore);
     std::string_view key;
     std::string_view value;
@@ -72,10 +74,10 @@ int ListUsers(int flags, const KeyFilter &wanted, std::vector<std::string> &name
         if (ParsePasswdLine(value, account) != 0)
             continue;
         const int kind = IsDomainName(account.name) ? TAVO_USER_DOMAIN : TAVO_USER_LOCAL;
-        if ((flags & kind) != 0 && IsListed(account, guest_is_supported) && wanted(key.substr(0, key.find('\0'))))
+        if ((flags & kind) != 0 && IsListed(account, *guest_is_supported) && wanted(key.substr(0, key.find('\0'))))
             names.push_back(account.name);
     }
-    return code == ERR_DB_END ? 0 : int{ERR_ENUM_FAILED};
+    return code == ERR_DB_END ? 0 : code == ERR_OUT_OF_MEMORY ? code : int{ERR_ENUM_FAILED};
 }
 
 }  // namespace tavo

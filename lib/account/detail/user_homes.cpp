@@ -32,22 +32,34 @@ Fd OpenDirectory(const char *path)
     return OpenFd(path, O_RDONLY | O_DIRECTORY);
 }
 
-// 0 when there is no such folder.
+// 0 with errno when there is no such folder.
 uint64_t InodeOf(const Fd &folder, const std::string &name)
 {
+    if (folder)
+        errno = ENOENT;
     struct stat st;
     return folder && IsFolderName(name) && ::fstatat(folder.Get(), name.c_str(), &st, AT_SYMLINK_NOFOLLOW) == 0
                ? uint64_t{st.st_ino}
                : 0;
 }
 
-// Where the share "homes" is; empty when there is none.
+// Where the share "homes" is; empty, when there is none. errno is ENOENT then, unless the settings cannot be read.
 std::string PathOfHomes()
 {
     const KeepFault keep;
     HashOwner pairs(PshTLIBSzHashAlloc(1024));
-    if (!pairs || TLIBFileGetSection(kShareSettings, "homes", pairs.Addr()) < 0)
+    if (!pairs)
+        throw std::bad_alloc();
+    tavoerrno = 0;
+    errno = ENOENT;
+    if (TLIBFileGetSection(kShareSettings, "homes", pairs.Addr()) < 0) {
+        if (tavoerrno == ERR_OUT_OF_MEMORY)
+            throw std::bad_alloc();
+        if (tavoerrno == ERR_SECTION_NOT_FOUND)
+            errno = ENOENT;
         return {};
+    }
+    errno = ENOENT;
     const char *path = SzTLIBSzHashGetValue(pairs.Get(), "path");
     return path ? path : "";
 }
@@ -81,11 +93,20 @@ HomeResult MakeHome(const HomeStep &step)
                : HomeResult::kFailed;
 }
 
+// Whether the folder of a step is still to be moved: kDone when it is not there any more.
+std::optional<HomeResult> WithoutFolder(const Fd &homes, const HomeStep &step)
+{
+    const uint64_t inode = InodeOf(homes, step.name);
+    if (inode == step.inode)
+        return std::nullopt;
+    return inode != 0 || errno == ENOENT || errno == ENOTDIR ? HomeResult::kDone : HomeResult::kFailed;
+}
+
 HomeResult MoveHome(const HomeStep &step)
 {
     const Fd homes = OpenDirectory(kHomes);
-    if (InodeOf(homes, step.name) != step.inode)
-        return HomeResult::kDone;
+    if (const std::optional<HomeResult> result = WithoutFolder(homes, step))
+        return *result;
     // Never into or over a folder that is there already.
     if (IsFolderName(step.new_name) &&
         ::renameat2(homes.Get(), step.name.c_str(), homes.Get(), step.new_name.c_str(), RENAME_NOREPLACE) == 0)
@@ -117,8 +138,8 @@ HomeResult StageHome(const HomeStep &step, const std::vector<std::string> &stage
 {
     const std::string path = PathOfHomes();
     const Fd homes = path.empty() ? Fd() : OpenDirectory(path.c_str());
-    if (InodeOf(homes, step.name) != step.inode)
-        return HomeResult::kDone;
+    if (const std::optional<HomeResult> result = WithoutFolder(homes, step))
+        return *result;
     const std::string *stage = StageOn(VolumeOf(path), stages);
     const Fd aside = stage ? OpenStage(*stage) : Fd();
     if (!aside)
@@ -136,31 +157,53 @@ bool MoveByCommand(const std::string &from, const std::string &to)
 
 }  // namespace
 
-void PlanHomes(std::span<const DoneUser> done, Marker &marker)
+HomePlan PlanHomes(std::span<const DoneUser> done, Marker &marker)
 {
-    if (!SettingIsYes(kSettings, "userHomeEnable"))
-        return;
+    HomePlan plan;
+    const std::optional<bool> enabled = ReadSetting(kSettings, "userHomeEnable", "yes");
+    if (!enabled)
+        plan.Unknown("");
+    if (!enabled.value_or(false))
+        return plan;
     const Fd homes = OpenDirectory(kHomes);
     for (const DoneUser &user : done) {
         if (user.IsAdded())
             marker.homes.push_back({HomeStep::kMake, user.name, {}, user.uid, user.gid, 0});
-        else if (user.IsRenamed())
-            if (const uint64_t inode = InodeOf(homes, user.old_name))
-                marker.homes.push_back({HomeStep::kMove, user.old_name, user.name, -1, -1, inode});
+        if (!user.IsRenamed())
+            continue;
+        if (const uint64_t inode = InodeOf(homes, user.old_name))
+            marker.homes.push_back({HomeStep::kMove, user.old_name, user.name, -1, -1, inode});
+        else
+            plan.Unknown(user.old_name);
     }
+    return plan;
 }
 
-void PlanRemovals(std::span<const std::string> names, Marker &marker)
+HomePlan PlanRemovals(std::span<const std::string> names, Marker &marker)
 {
+    HomePlan plan;
     const std::string path = PathOfHomes();
+    if (path.empty())
+        plan.Unknown("");
     const std::string volume = VolumeOf(path);
     const Fd homes = volume.empty() ? Fd() : OpenDirectory(path.c_str());
     const size_t before = marker.homes.size();
     for (const std::string &name : names)
         if (const uint64_t inode = InodeOf(homes, name))
             marker.homes.push_back({HomeStep::kRemove, name, {}, -1, -1, inode});
+        else if (!volume.empty())
+            plan.Unknown(name);
     if (marker.homes.size() > before)
         marker.stages.push_back(volume + "/@tmp/@del_users_home_" + std::to_string(::getpid()));
+    return plan;
+}
+
+void HomePlan::Unknown(std::string name)
+{
+    if (errno == ENOENT || errno == ENOTDIR)
+        return;
+    reason = errno;
+    unknown.push_back(std::move(name));
 }
 
 HomeResult TakeHomeStep(const HomeStep &step, const std::vector<std::string> &stages)

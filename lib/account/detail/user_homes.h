@@ -11,12 +11,20 @@
 
 namespace tavo {
 
+// Folders that could not be looked for, and are not planned.
+struct HomePlan {
+    std::vector<std::string> unknown;  // names of users; "" when it is about all of them
+    int reason = 0;                    // errno
+
+    void Unknown(std::string name);  // unless errno says that there is none
+};
+
 // The steps for users that were added and renamed: none unless the appliance has home folders. A folder is known by its
 // inode, so that a step that is taken twice, or late, never takes somebody else's.
-void PlanHomes(std::span<const DoneUser> done, Marker &marker);
+HomePlan PlanHomes(std::span<const DoneUser> done, Marker &marker);
 
 // The steps for users that are deleted: their folders go to a staging folder on the same volume.
-void PlanRemovals(std::span<const std::string> names, Marker &marker);
+HomePlan PlanRemovals(std::span<const std::string> names, Marker &marker);
 
 enum class HomeResult {
     kDone,       // also when there is nothing to do any more

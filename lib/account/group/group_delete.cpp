@@ -18,26 +18,32 @@ constexpr unsigned kLocksOfDelete = TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
 
 using Deleted = std::map<std::string, std::string>;  // key to name
 
-// Deletes one group; what goes wrong is logged and stays in the error state.
-void DeleteOne(const TAVOGROUPDB &db, const char *name, Deleted &deleted)
+// Deletes one group; what goes wrong is logged and stays in the error state. False when the stores can no longer be trusted:
+// then nothing of the call may be kept.
+bool DeleteOne(const TAVOGROUPDB &db, const char *name, Deleted &deleted)
 {
     if (name && tavo::IsDomainName(name))
-        return;  // lives in its domain
+        return true;  // lives in its domain
     const std::optional<std::string> key = name ? tavo::AccountKey(name, tavo::kGroupKeySize) : std::nullopt;
-    if (key && deleted.contains(*key))
-        return LogNotice("%s:%d Duplicate group name:[%s]", name);
+    if (key && deleted.contains(*key)) {
+        LogNotice("%s:%d Duplicate group name:[%s]", name);
+        return true;
+    }
     tavo::GroupLine group;
     int code = key ? tavo::ReadGroupLine(db, *key, group) : int{ERR_NO_SUCH_GROUP};
     if (code == ERR_NO_SUCH_GROUP) {
         Fail(code);
-        return LogError("%s:%d Group [%s] does not exist", name ? name : "");
+        LogError("%s:%d Group [%s] does not exist", name ? name : "");
+        return true;
     }
     code = tavo::RemoveGroup(db, *key, group.gid);
     if (code != 0) {
         Fail(code);
-        return LogError("%s:%d TAVOGroupDBDelete %s failed. tavoerr=0x%04X", name, code);
+        LogError("%s:%d TAVOGroupDBDelete %s failed. tavoerr=0x%04X", name, code);
+        return false;
     }
     deleted.emplace(*key, group.name);
+    return true;
 }
 
 }  // namespace
@@ -55,7 +61,8 @@ extern "C" int TAVOGroupDelete(const char *const *rgszName, int nGroup)
         Deleted deleted;
         change.Session().BeginChange();
         for (int i = 0; i < nGroup; ++i)
-            DeleteOne(tavo::GroupDb(change.Session()), rgszName[i], deleted);
+            if (!DeleteOne(tavo::GroupDb(change.Session()), rgszName[i], deleted))
+                return -1;
         for (const auto &[key, name] : deleted)
             change.Files().Steps().names.push_back(
                 {.is_group = true, .targets = tavo::kShareLists | tavo::kSambaLists, .old_name = name, .new_name = {}});

@@ -13,8 +13,6 @@ extern "C" int TAVOGroupGet(const char *szName, TAVOGROUP **ppGroup)
     if (!szName || !*szName || !ppGroup)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        if (tavo::IsDomainName(szName))
-            return Fail(ERR_NO_SUCH_GROUP);  // this appliance has joined no domain
         const std::optional<std::string> key = tavo::AccountKey(szName, tavo::kGroupKeySize);
         if (!key)
             return Fail(ERR_INVALID_GROUPNAME);

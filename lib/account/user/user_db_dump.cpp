@@ -2,6 +2,7 @@
 #include "tavo_user.h"
 
 #include "account/detail/account_transaction.h"
+#include "account/detail/commit_resume.h"
 #include "account/detail/family_dump.h"
 #include "account/detail/user_accounts.h"
 #include "account/detail/user_dump.h"
@@ -21,15 +22,30 @@ void LogMissing(const DumpReport &report)
         LogDebug("%s:%d No record of [%s] for %s", missing.name, missing.file);
 }
 
+void LogDropped(const DumpReport &report)
+{
+    for (const std::string &line : report.passwd.dropped)
+        LogError("%s:%d Line [%s] of %s is not an account and is not written again", line,
+                 tavo::kUserTextRows[tavo::kPasswdText].path);
+}
+
 int FailUserDump(int code, const DumpReport &report)
 {
     if (report.not_opened)
         LogError("%s:%d fail to open file[%s]", report.not_opened);
-    else if (!report.lost.empty())
-        LogError("%s:%d Account [%s] would be lost, the files are left alone", report.lost);
+    else if (!report.passwd.lost.empty())
+        LogError("%s:%d Account [%s] would be lost, the files are left alone", report.passwd.lost);
     else
         LogError("%s:%d Failed to write the account files, tavoerr=0x%04X, errno=%d", code, errno);
     return Fail(code);
+}
+
+// The files have changed by then. Stores without the times are only built again.
+void RecordTimes(const TAVOUSERDB &db) noexcept
+try {
+    TAVOBDB *const stores[] = {db.pName, db.pMisc, db.pShadow, db.pSmb, db.pUid};
+    tavo::RecordSyncTimes(tavo::kUserFamily, stores);
+} catch (const std::bad_alloc &) {
 }
 
 }  // namespace
@@ -48,7 +64,10 @@ int tavo::CommitUsers(AccountTransaction &change)
     LogMissing(report);
     if (code == 0)
         code = change.Commit();
-    return code == 0 ? 0 : FailUserDump(code, report);
+    if (code != 0)
+        return FailUserDump(code, report);
+    LogDropped(report);
+    return 0;
 }
 
 extern "C" int TAVOUserDBDump(TAVOUSERDB *pDb)
@@ -69,8 +88,8 @@ extern "C" int TAVOUserDBDump(TAVOUSERDB *pDb)
             code = commit.Commit();
         if (code != 0)
             return FailUserDump(code, report);
-        TAVOBDB *const stores[] = {pDb->pName, pDb->pMisc, pDb->pShadow, pDb->pSmb, pDb->pUid};
-        tavo::RecordSyncTimes(tavo::kUserFamily, stores);
+        LogDropped(report);
+        RecordTimes(*pDb);
         commit.Settle();
         return 0;
     });

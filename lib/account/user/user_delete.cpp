@@ -40,9 +40,13 @@ std::vector<Doomed> Collect(const TAVOUSERDB &db, const char *const *names, int 
         if (tavo::IsDomainName(names[i]))
             continue;
         tavo::PasswdLine account;
-        if (!key || tavo::ReadPasswdLine(db, *key, account) != 0) {
+        const int code = key ? tavo::ReadPasswdLine(db, *key, account) : int{ERR_KEY_NOT_FOUND};
+        if (code == ERR_KEY_NOT_FOUND) {
             Fail(ERR_NO_SUCH_USER);
             LogError("%s:%d User [%s] does not exist", names[i]);
+        } else if (code != 0) {
+            Fail(code);
+            LogError("%s:%d Failed to delete user [%s], tavoerr=0x%04X", names[i], code);
         } else if (!seen.insert(*key).second) {
             LogError("%s:%d Duplicate username:%s", names[i]);
         } else {
@@ -68,10 +72,10 @@ void ClearQuotas(const std::vector<Doomed> &doomed)
 
 void TellServices(const std::vector<Doomed> &doomed)
 {
-    if (tavo::SettingIsYes(tavo::kFactorySettings, "support_download") &&
+    if (tavo::ReadSetting(tavo::kFactorySettings, "support_download", "yes").value_or(false) &&
         TAVOSchedulerHup(tavo::kReadAccountsAgain) != 0)
         LogError("%s:%d Failed to signal scheduled.");
-    if (tavo::SettingIsYes(tavo::kSettings, "runsamba"))
+    if (tavo::ReadSetting(tavo::kSettings, "runsamba", "yes").value_or(false))
         for (const Doomed &user : doomed)
             tavo::EndSmbConnections(user.name);
 }
@@ -90,7 +94,9 @@ void PlanRemoval(const std::vector<Doomed> &doomed, tavo::AccountTransaction &ch
         if (!change.Backup().Remove(user.name))
             LogError("%s:%d Failed to remove the network backup credentials of [%s]", user.name);
     }
-    tavo::PlanRemovals(names, steps);
+    const tavo::HomePlan plan = tavo::PlanRemovals(names, steps);
+    for (const std::string &name : plan.unknown)
+        LogError("%s:%d Failed to look for the home folder of [%s], errno=%d", name, plan.reason);
 }
 
 }  // namespace

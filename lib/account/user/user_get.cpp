@@ -14,8 +14,6 @@ extern "C" int TAVOUserGet(const char *szName, TAVOUSER **ppUser)
     if (!szName || !*szName || !ppUser)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        if (tavo::IsDomainName(szName))
-            return Fail(ERR_NO_SUCH_USER);  // this appliance has joined no domain
         const std::optional<std::string> key = tavo::AccountKey(szName);
         if (!key)
             return Fail(ERR_INVALID_USERNAME);

@@ -21,8 +21,13 @@ extern "C" int TAVOUserGetValidUserList(const char *const *rgszName, char *szBuf
         for (; *rgszName; ++rgszName) {
             const std::optional<std::string> key = tavo::AccountKey(*rgszName);
             std::string_view line;
-            if (**rgszName && key && session.View(tavo::kNameStore)->Get(*key, line) == 0)
+            if (!**rgszName || !key)
+                continue;
+            const int code = session.View(tavo::kNameStore)->Get(*key, line);
+            if (code == 0)
                 valid.append(valid.empty() ? "" : ",").append(*rgszName);
+            else if (code != ERR_KEY_NOT_FOUND)
+                return Fail(code);
         }
         const size_t length = valid.size() + 1;
         if (szBuf && length > static_cast<size_t>(cbBuf))

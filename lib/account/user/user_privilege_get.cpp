@@ -23,8 +23,6 @@ extern "C" int TAVOUserPrivilegeGet(const char *szName)
         int32_t privilege = 0;
         if (const int code = tavo::ReadPrivilege(session, *key, privilege))
             return Fail(code);
-        return tavo::IsDomainName(szName)       ? int{TAVO_USER_PRIVILEGE_DOMAIN}
-               : *key == tavo::WithNul("GUEST") ? 0
-                                                : int{privilege};
+        return *key == tavo::WithNul("GUEST") ? 0 : int{privilege};
     });
 }

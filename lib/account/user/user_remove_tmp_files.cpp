@@ -1,7 +1,7 @@
 // Removes the temporary files beside the account files.
 #include "tavo_user.h"
 
-#include "account/detail/account_commit.h"
+#include "account/detail/commit_resume.h"
 #include "core/detail/fault.h"
 
 extern "C" int TAVOUserRemoveTmpFiles(void)

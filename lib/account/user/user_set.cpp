@@ -38,7 +38,7 @@ void SetCredentials(const std::vector<tavo::DoneUser> &done, tavo::NetBackupUser
 // What else on the appliance knows these users.
 void PlanFollowUp(const std::vector<tavo::DoneUser> &done, tavo::AccountTransaction &change)
 {
-    const bool has_backup = tavo::SettingIsYes(tavo::kFactorySettings, "netbkp");
+    const bool has_backup = tavo::ReadSetting(tavo::kFactorySettings, "netbkp", "yes").value_or(false);
     tavo::Marker &steps = change.Files().Steps();
     const unsigned targets =
         tavo::kSambaLists | tavo::kMemberLists | tavo::kFtpList | (has_backup ? unsigned{tavo::kBackupUsers} : 0);
@@ -52,7 +52,9 @@ void PlanFollowUp(const std::vector<tavo::DoneUser> &done, tavo::AccountTransact
     }
     if (has_backup)
         SetCredentials(done, change.Backup());
-    tavo::PlanHomes(done, steps);
+    const tavo::HomePlan plan = tavo::PlanHomes(done, steps);
+    for (const std::string &name : plan.unknown)
+        LogError("%s:%d Failed to look for the home folder of [%s], errno=%d", name, plan.reason);
 }
 
 // True when the stores can still be trusted.
@@ -85,7 +87,7 @@ extern "C" int TAVOUserSet(const char *const *rgszOldName, const TAVOUSER *const
         change.Session().BeginChange();
         if (!ApplyAll(batch, rgszOldName, rgpUser, nUser))
             return -1;
-        if (tavo::SettingIsYes(tavo::kFactorySettings, "support_download") &&
+        if (tavo::ReadSetting(tavo::kFactorySettings, "support_download", "yes").value_or(false) &&
             TAVOSchedulerHup(tavo::kReadAccountsAgain) != 0)
             LogError("%s:%d Failed to signal scheduled.");
         if (batch.Done().empty()) {

@@ -62,6 +62,8 @@ Outcome SetHashes(const TAVOUSERDB &db, const char *name, const NewHashes &hashe
     const std::optional<std::string> key = tavo::AccountKey(name);
     if (!key)
         return {ERR_INVALID_USERNAME};
+    if (tavo::IsDomainName(name))
+        return {ERR_NO_SUCH_USER};  // its password is kept in the domain
     std::string shadow;
     std::string samba;
     if (const int code = ReplaceHashes(db, *key, hashes, shadow, samba))

@@ -34,13 +34,14 @@ struct Extras {
     void (*des)(const uint8_t key[8], const uint8_t block[8], uint8_t out[8]);
     void (*md4)(const uint8_t *data, size_t length, uint8_t digest[16]);
 
-    // The database: dbopen for a btree, whose handle is its own table of functions, and the function that it calls in
-    // place of fsync (nullptr: fsync again).
+    // The database: dbopen for a btree, whose handle is its own table of functions; the end of it, -1 with errno when not
+    // everything was written; and the function that it calls in place of fsync (nullptr: fsync again).
     void *(*open_btree)(const char *path, int flags, int mode, bool parameters);
+    int (*close_btree)(void *store);
     void (*sync_by)(int (*sync)(int fd));
 };
 
-inline constexpr uint32_t kExtrasVersion = 1;
+inline constexpr uint32_t kExtrasVersion = 2;
 inline constexpr char kExtrasFile[] = "libtavosdk-extras.so.1";
 inline constexpr char kExtrasSymbol[] = "tavosdk_extras";
 inline constexpr int32_t kNoSubstitute = -1;

@@ -5,6 +5,9 @@
 
 #include "core/detail/keep_fault.h"
 
+#include <cerrno>
+#include <new>
+
 #include <strings.h>
 
 namespace tavo {
@@ -25,6 +28,20 @@ bool SettingSaysYes(const char *path, const char *key) noexcept
     char value[8];  // a longer value is not a "yes"
     const KeepFault keep;
     return TLIBFileGetKeyValue(path, key, value, sizeof value, 0) > 0 && ::strcasecmp(value, "yes") == 0;
+}
+
+std::optional<bool> ReadSetting(const char *path, const char *key, const char *value)
+{
+    const KeepFault keep;
+    tavoerrno = 0;
+    errno = 0;
+    if (BlTAVOFileCheckKeyValue(path, key, value) != 0)
+        return true;
+    if (tavoerrno == ERR_OUT_OF_MEMORY)
+        throw std::bad_alloc();
+    const bool unreadable =
+        tavoerrno == ERR_READ_FAILED || (tavoerrno == ERR_OPEN_FAILED && errno != ENOENT && errno != EACCES);
+    return unreadable ? std::nullopt : std::optional(false);
 }
 
 }  // namespace tavo

@@ -4,6 +4,8 @@
 
 #include "core/detail/appliance_paths.h"
 
+#include <optional>
+
 namespace tavo {
 
 // Whether the key has exactly this value.
@@ -14,6 +16,10 @@ bool SettingIsYes(const char *path, const char *key) noexcept;
 
 // Whether the value is "yes" in any case of letters: services and capabilities of the model.
 bool SettingSaysYes(const char *path, const char *key) noexcept;
+
+// Whether the key has exactly that value; nothing when the file is there and cannot be read. Leaves the error state alone.
+// Throws bad_alloc.
+std::optional<bool> ReadSetting(const char *path, const char *key, const char *value);
 
 }  // namespace tavo
 

@@ -4,6 +4,7 @@
 #include "tavo_user.h"
 
 #include "account/group/group_fixture.h"
+#include "account/known_everywhere.h"
 #include "support/rounds.h"
 #include "support/scratch_dir.h"
 #include "support/traced_call.h"
@@ -11,7 +12,6 @@
 #include <gtest/gtest.h>
 
 #include <functional>
-#include <map>
 
 #include <sys/stat.h>
 #include <unistd.h>
@@ -27,57 +27,13 @@ extern "C" time_t time(time_t *out) noexcept
 
 namespace {
 
-using Files = std::map<std::string, std::string>;
-
-constexpr const char *kFiles[] = {
-    "/etc/passwd",    "/etc/shadow",         "/etc/tavouser.conf",         "/usr/tavo/etc/private/smbpasswd",
-    "/etc/group",     "/etc/group_desc",     "/usr/tavo/etc/smb.conf",     "/usr/tavo/etc/share.conf",
-    "/etc/ftpchroot", "/etc/rsyncd.secrets", "/usr/tavo/etc/netbkp.users", "/usr/tavo/etc/afpd.conf",
-};
-constexpr char kHomeFolder[] = "/var/services/homes";
-
-// The text of every file, and who has a home with what in it.
-Files Everything()
-{
-    Files found;
-    for (const char *path : kFiles)
-        found[path] = test::FileText(path);
-    for (const char *folder : {kHomeFolder, "/volume1/homes"})
-        for (const auto &home : std::filesystem::directory_iterator(folder))
-            found[home.path()] = test::FileText((home.path() / "file").c_str());
-    return found;
-}
-
-void PutBack(const Files &files)
-{
-    for (const char *folder : {kHomeFolder, "/volume1/homes", "/volume1/@tmp"})
-        std::filesystem::remove_all(folder);
-    for (const char *folder : {kHomeFolder, "/volume1/homes"})
-        std::filesystem::create_directories(folder);
-    for (const auto &[path, text] : files) {
-        if (path.starts_with(kHomeFolder) || path.starts_with("/volume1/homes")) {
-            std::filesystem::create_directories(path);
-            test::WriteFile(path + "/file", text);
-        } else if (test::FileText(path.c_str()) != text) {
-            test::WriteFile(path, text);
-        }
-    }
-}
-
-void SetUsers(const std::vector<std::pair<const char *, const char *>> &changes, const char *password)
-{
-    std::vector<TAVOUSER *> users;
-    std::vector<const char *> old_names;
-    for (const auto &[old_name, name] : changes) {
-        TAVOUSER *user = nullptr;
-        TAVOUserAlloc(&user, name, password, -1, -1, "", "", "", -1, 0, "", 0);
-        users.push_back(user);
-        old_names.push_back(old_name);
-    }
-    TAVOUserSet(old_names.data(), users.data(), static_cast<int>(users.size()));
-    for (TAVOUSER *user : users)
-        TAVOUserFree(user);
-}
+using test::Difference;
+using test::Everything;
+using test::Files;
+using test::NextChange;
+using test::PutBack;
+using test::SetUsers;
+using test::StartKnownEverywhere;
 
 void DeleteUsers(std::vector<const char *> names)
 {
@@ -117,49 +73,6 @@ const struct Work {
          SetUsers({{nullptr, "dave"}, {"alice", "robert"}, {"carol", "carol"}, {"guest", "guest"}}, "b");
      }},
 };
-
-// Accounts that every neighbour knows.
-void StartKnownEverywhere()
-{
-    std::filesystem::create_directories("/volume1/homes");
-    std::filesystem::create_directories(kHomeFolder);
-    std::filesystem::create_directories("/usr/tavo/etc");
-    test::WriteFile("/etc/tavoinfo.conf", "userHomeEnable=\"yes\"\n");
-    test::WriteFile("/etc.defaults/tavoinfo.conf", "netbkp=\"yes\"\nmaxaccounts=\"2048\"\n");
-    SetUsers({{nullptr, "alice"}, {nullptr, "bob"}, {nullptr, "carol"}}, "secret");
-    ASSERT_EQ(test::AddGroup("staff", -1, {"alice", "bob", "carol"}), 0);
-    ASSERT_EQ(TAVOGroupDescSet("staff", "old hands"), 0);
-    test::WriteFile("/usr/tavo/etc/smb.conf", "[x]\n\tvalid users = alice,@staff,bob,carol\n\twrite list = \"bob\"\n");
-    test::WriteFile("/usr/tavo/etc/share.conf",
-                    "[homes]\n\tpath=\"/volume1/homes\"\n[x]\n\treadwrite=\"alice,@staff,@users\"\n");
-    test::WriteFile("/etc/ftpchroot", "alice\nbob\n");
-    test::WriteFile("/usr/tavo/etc/netbkp.users", "alice\nbob\ndave\n");
-    test::WriteFile("/etc/rsyncd.secrets", "alice:secret\nbob:secret\n", 0600);
-    test::WriteFile("/usr/tavo/etc/afpd.conf", "- -uamlist uams_guest.so\n");
-    for (const char *folder : {kHomeFolder, "/volume1/homes"})
-        for (const std::string name : {"alice", "bob", "carol"}) {
-            std::filesystem::create_directories(std::string(folder) + "/" + name);
-            test::WriteFile(std::string(folder) + "/" + name + "/file", name + "'s");
-        }
-}
-
-// Any change of another account finishes what was begun; this one leaves everything as it is.
-int NextChange()
-{
-    return TAVOGroupDescSet("users", "Every local user");
-}
-
-std::string Difference(const Files &found, const Files &wanted)
-{
-    std::string text;
-    for (const auto &[path, content] : wanted)
-        if (!found.contains(path) || found.at(path) != content)
-            text += path + " has\n" + (found.contains(path) ? found.at(path) : "(nothing)") + "instead of\n" + content;
-    for (const auto &[path, content] : found)
-        if (!wanted.contains(path))
-            text += path + " is there\n";
-    return text;
-}
 
 void ExpectNothingLeft()
 {

@@ -191,12 +191,11 @@ void LookInto(Loot &loot, const std::string &path)
 {
     ++loot.tries;
     if (const int fd = ::open(path.c_str(), O_RDWR | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK); fd >= 0) {
-        if (Look(path).st_uid != test::kNobody)
-            ++loot.writable;
         struct stat st = {};
-        void *mapped = ::fstat(fd, &st) == 0 && st.st_size >= 4096
-                           ? ::mmap(nullptr, 4096, PROT_READ | PROT_WRITE, MAP_SHARED, fd, 0)
-                           : MAP_FAILED;
+        if (::fstat(fd, &st) != 0 || st.st_uid != test::kNobody)
+            ++loot.writable;
+        void *mapped =
+            st.st_size >= 4096 ? ::mmap(nullptr, 4096, PROT_READ | PROT_WRITE, MAP_SHARED, fd, 0) : MAP_FAILED;
         if (mapped != MAP_FAILED)
             std::memset(mapped, 0, 4096);
         ::close(fd);

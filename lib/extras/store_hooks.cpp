@@ -1,0 +1,134 @@
+// What the database calls in place of the C library. It has two interfaces whose headers cannot be included together.
+#include "extras/parts.h"
+
+#include <algorithm>
+#include <atomic>
+#include <cerrno>
+#include <cstdarg>
+#include <cstdlib>
+#include <iterator>
+#include <utility>
+
+#include <db.h>
+#include <fcntl.h>
+#include <unistd.h>
+
+namespace tavo::extras {
+namespace {
+
+// An environment is what the database allocates first for an open, in two pieces. When it cannot have the second one its
+// clean-up reads through the pointer to it, so both are set aside before.
+constexpr size_t kPieceOfEnvironment = 8 << 10;
+static_assert(sizeof(DB_ENV) <= kPieceOfEnvironment);
+
+// The thread whose calls are seen to; 0 when there is none. What the database calls is one for the whole program, and a
+// lock would stay locked in a child of it: of two threads at once the second one goes without.
+constinit std::atomic<pid_t> owner = 0;
+
+constinit void *spares[2] = {nullptr, nullptr};
+constinit int opened[8] = {-1, -1, -1, -1, -1, -1, -1, -1};
+constinit int close_error = 0;
+
+bool IsOwner() noexcept
+{
+    return owner == ::gettid();
+}
+
+void Exchange(int from, int to) noexcept
+{
+    if (int *const place = std::find(std::begin(opened), std::end(opened), from); place != std::end(opened))
+        *place = to;
+}
+
+void *AllocateOrSpare(size_t size) noexcept
+{
+    void *block = std::malloc(size);
+    if (!block && IsOwner() && size <= kPieceOfEnvironment)
+        for (void *&spare : spares)
+            if (!block)
+                std::swap(block, spare);
+    return block;
+}
+
+int OpenNoted(const char *path, int flags, ...) noexcept
+{
+    va_list rest;
+    va_start(rest, flags);
+    const int mode = va_arg(rest, int);
+    va_end(rest);
+    const int fd = ::open(path, flags | O_CLOEXEC, mode);
+    if (fd >= 0 && IsOwner())
+        Exchange(-1, fd);
+    return fd;
+}
+
+// The system has closed the file, whatever it says. The database would close the number again, which may be somebody
+// else's by then, or crash over what it has freed.
+int CloseOnce(int fd) noexcept
+{
+    const bool mine = IsOwner();
+    if (mine)
+        Exchange(fd, -1);
+    if (::close(fd) != 0 && errno != EINTR && mine)
+        close_error = errno;
+    return 0;
+}
+
+}  // namespace
+
+void SyncBy(int (*sync)(int fd)) noexcept
+{
+    ::db_env_set_func_fsync(sync);
+}
+
+DatabaseCall::DatabaseCall() noexcept
+{
+    pid_t none = 0;
+    is_owner_ = owner.compare_exchange_strong(none, ::gettid());
+    if (!is_owner_)
+        return;
+    std::fill(std::begin(opened), std::end(opened), -1);
+    close_error = 0;
+    ::db_env_set_func_malloc(AllocateOrSpare);
+    ::db_env_set_func_open(OpenNoted);
+    ::db_env_set_func_close(CloseOnce);
+}
+
+DatabaseCall::~DatabaseCall()
+{
+    if (!is_owner_)
+        return;
+    const int saved = errno;
+    ::db_env_set_func_close(nullptr);
+    ::db_env_set_func_open(nullptr);
+    ::db_env_set_func_malloc(nullptr);
+    for (void *&spare : spares)
+        std::free(std::exchange(spare, nullptr));
+    owner = 0;
+    errno = saved;
+}
+
+bool DatabaseCall::Reserve() noexcept
+{
+    if (is_owner_)
+        for (void *&spare : spares)
+            if (!spare && !(spare = std::malloc(kPieceOfEnvironment)))
+                return false;
+    return true;
+}
+
+int DatabaseCall::CloseError() const noexcept
+{
+    return is_owner_ ? close_error : 0;
+}
+
+void DatabaseCall::CloseLeft() noexcept
+{
+    const int saved = errno;
+    for (int &fd : opened)
+        if (is_owner_ && fd >= 0)
+            ::close(std::exchange(fd, -1));
+    errno = saved;
+}
+
+}  // namespace tavo::extras
