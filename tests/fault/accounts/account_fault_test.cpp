@@ -203,7 +203,7 @@ constexpr Call kCalls[] = {
     {"get group by id",
      [](Outcome &outcome) {
          TAVOGROUP *group = nullptr;
-         const int result = TAVOGroupGetByGID(65537, &group);
+         const int result = TAVOGroupGetByGID(101, &group);
          return ShowGroup(result, group, outcome);
      }},
     {"list groups",
