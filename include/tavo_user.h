@@ -178,9 +178,13 @@ TAVO_API int TAVOUserGetValidUserList(const char *const *rgszName, char *szBuf, 
  *   ERR_TOO_MANY_USERS    all user ids are taken
  *   ERR_FORMAT_ERROR      a stored line has the wrong number of fields
  *   ERR_BAD_PARAMETERS    a text holds what its file cannot: a newline, a carriage return, a colon (home, shell, mail)
+ *   ERR_READ_FAILED       the settings that say how passwords are hashed cannot be read
+ *   ERR_REMOVE_FAILED     rights of an earlier account of this name could not be removed yet; a later call tries again
  * Returns 0 when the batch was carried through, even if entries failed: read the accounts back, or look at the error
  * code, which holds that of the last entry that failed. Returns -1, with no account changed, with
  *   ERR_BAD_PARAMETERS    an array is NULL, or nUser negative
+ *   ERR_ACCESS_DENIED     the program is not root
+ *   ERR_OUT_OF_MEMORY     no memory
  *   ERR_WRITE_FAILED, ERR_NOT_ENOUGH_SPACE  the files cannot be written, or would lose an account that they have
  *   ERR_RENAME_FAILED     a file cannot be moved into place; when others were before it, the next call finishes that
  *   ERR_DB_STORE, ERR_DB_DELETE  the database cannot be changed
