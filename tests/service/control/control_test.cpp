@@ -426,15 +426,32 @@ TEST_F(Services, AVolumeGoesAndComesBack)
     TAVOSERVICESHARE share;
     EXPECT_EQ(TAVOServiceSettingGet(1, &share), 0);
     EXPECT_EQ(TAVOServiceIsOnVolume(1, "/volume2"), 1) << "that is where it belongs";
+    EXPECT_EQ(TAVOServiceIsOnVolume(1, "/volume1"), 0);
+    for (const char *path : {"", "/volume", "/volume2/", static_cast<const char *>(nullptr)}) {
+        EXPECT_EQ(TAVOServiceIsOnVolume(1, path), -1) << path;
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_is_on_volume"}));
+        EXPECT_EQ(TAVOServiceRestore(path), -1) << path;
+        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_restore"}));
+    }
+    EXPECT_EQ(TAVOServiceIsOnVolume(0, "/volume2"), -1);
 
     ASSERT_EQ(::mount("tmpfs", "/volume2", "tmpfs", 0, "size=8m"), 0);
     ASSERT_EQ(::mkdir("/volume2/web", 0755), 0);
     char volume[52];
     EXPECT_EQ(TAVOServiceDataSearch(1, volume, sizeof volume), 2);
     ScriptCalls();
+    log_.Clear();
+    EXPECT_EQ(TAVOServiceRestore("/volume1"), 0);
+    EXPECT_THAT(ScriptCalls(), IsEmpty()) << "none has a folder there";
     EXPECT_EQ(TAVOServiceRestore("/volume2"), 1);
     EXPECT_THAT(ScriptCalls(), ElementsAre("S97apache-user.sh start"));
     EXPECT_TRUE(IsUp(0));
+    EXPECT_THAT(log_.Texts(), IsEmpty());
+    ASSERT_EQ(TAVOServiceActionSet(0, TAVO_SERVICE_STOP), 0);
+    test::WriteFile("/var/standin/httpd-user.mode", "dies\n");
+    EXPECT_EQ(TAVOServiceRestore("/volume2"), 1) << "bound, but not started";
+    EXPECT_THAT(log_.Texts(),
+                testing::Contains(testing::MatchesRegex("service_restore:[0-9]+ Failed to start service web")));
     EXPECT_EQ(Setting("runweb"), "yes");
 
     EXPECT_EQ(TAVOServiceRemovebyVolume("/volume2", 0), 0);
