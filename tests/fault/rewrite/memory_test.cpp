@@ -66,6 +66,26 @@ TEST(OutOfMemory, LeavesALogThatIsNotEmptied)
     EXPECT_GT(faults.Count(), 0);
 }
 
+TEST(OutOfMemory, OpensNoTemporaryFile)
+{
+    const test::ScratchDir dir;
+    test::EachAllocation faults;
+    while (faults.Next()) {
+        std::string name = dir / "temp.XXXXXX";
+        faults.Arm();
+        FILE *temp = TLIBFileTempFileOpen(name.data());
+        faults.Disarm();
+        EXPECT_EQ(temp == nullptr, faults.Fired());
+        if (temp) {
+            std::fclose(temp);
+            continue;
+        }
+        EXPECT_EQ(test::LastFault(), (test::Fault{ERR_OPEN_FAILED, "file_tempfile_open", 49})) << "a published line";
+        EXPECT_EQ(dir.Names().size(), 0u);
+    }
+    EXPECT_GT(faults.Count(), 0);
+}
+
 TEST(OutOfMemory, OfTheSystemSettingsReleasesTheirLock)
 {
     if (test::RootForm().empty())

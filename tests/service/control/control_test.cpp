@@ -145,6 +145,15 @@ TEST(NetService, RestartsTheWebServersAroundEachOther)
                     ElementsAre("S97apache-user.sh stop", "S97apache-sys.sh restart", "S97apache-user.sh start"))
             << operation;
     }
+    test::WriteFile("/var/standin/S97apache-user.sh.status", "3\n");
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_WEB_SYSTEM | TAVO_DAEMON_WEB_USER, TAVO_DAEMON_RESTART), 0x40000000)
+        << "the user's server fails alone";
+    std::filesystem::remove("/var/standin/S97apache-user.sh.status");
+    test::WriteFile("/var/standin/httpd-user.mode", "dies\n");
+    EXPECT_EQ(TAVONetService(TAVO_DAEMON_WEB_SYSTEM | TAVO_DAEMON_WEB_USER, TAVO_DAEMON_RESTART), 0x40000000)
+        << "stopped, and not started again";
+    test::ResetStandins();
+    ScriptCalls();
 }
 
 TEST(NetService, ReloadsBySignal)
