@@ -291,7 +291,8 @@ TAVO_API int TAVONetIPv6AddrAdd(const char *szInterface, const char *szAddr, int
 TAVO_API int TAVONetIPv6AddrDel(const char *szInterface, const char *szAddr, int nPrefix);
 
 /* Pushes the addresses of an interface, as "ADDRESS/PREFIX", onto *ppAddrs, which may move (/proc/net/if_inet6). Returns
- * how many, or -1 with ERR_BAD_PARAMETERS or ERR_OUT_OF_MEMORY.
+ * how many, also 0 where the kernel has no IPv6, or -1 with ERR_BAD_PARAMETERS, ERR_OPEN_FAILED (the kernel's table cannot
+ * be read) or ERR_OUT_OF_MEMORY.
  * Files: /proc/net/if_inet6 */
 TAVO_API int TAVONetIPv6AddrEnum(const char *szInterface, TLIBSZLIST **ppAddrs);
 

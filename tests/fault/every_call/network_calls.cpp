@@ -197,7 +197,7 @@ Family NetworkFamily()
                  }),
             CALL(TAVONetIPv6AddrAdd, 0, { run(f, "eth0", "2001:db8::1", 64); }),
             CALL(TAVONetIPv6AddrDel, 0, { run(f, "eth0", "2001:db8::1", 64); }),
-            CALL(TAVONetIPv6AddrEnum, kAnswers,
+            CALL(TAVONetIPv6AddrEnum, 0,
                  {
                      Found found;
                      run(f, "eth0", &found.list);
