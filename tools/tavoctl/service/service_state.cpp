@@ -6,15 +6,13 @@
 #include "frame/host.h"
 #include "frame/processes.h"
 #include "frame/suggestion.h"
+#include "storage/mounted_volumes.h"
 
 #include "tavo_file.h"
 #include "tavo_proc.h"
 #include "tavo_service.h"
 
 #include <algorithm>
-#include <fstream>
-#include <set>
-#include <sstream>
 
 #include <strings.h>
 
@@ -101,31 +99,23 @@ std::vector<int32_t> FoldersOf(int id)
     return folders;
 }
 
-std::vector<std::string> MountedVolumes()
+std::vector<std::string> VolumePaths()
 {
-    std::set<std::string> volumes;
-    std::ifstream mounts("/proc/mounts");
-    for (std::string line; std::getline(mounts, line);) {
-        std::string source;
-        std::string path;
-        std::istringstream(line) >> source >> path;
-        constexpr std::string_view stem = "/volume";
-        if (path.starts_with(stem) && path.size() > stem.size() &&
-            path.find_first_not_of("0123456789", stem.size()) == std::string::npos)
-            volumes.insert(path);
-    }
-    return {volumes.begin(), volumes.end()};
+    std::vector<std::string> paths;
+    for (const MountedVolume &volume : MountedVolumes())
+        paths.push_back(volume.path);
+    return paths;
 }
 
 bool IsMounted(const std::string &volume)
 {
-    const std::vector<std::string> volumes = MountedVolumes();
+    const std::vector<std::string> volumes = VolumePaths();
     return std::find(volumes.begin(), volumes.end(), volume) != volumes.end();
 }
 
 const ArgumentKind service_kind = {.name = "service", .candidates = ServiceNames, .sample = "no-service"};
 
-const ArgumentKind mounted_kind = {.name = "volume", .candidates = MountedVolumes, .sample = "/volume9998"};
+const ArgumentKind mounted_kind = {.name = "volume", .candidates = VolumePaths, .sample = "/volume9998"};
 
 std::string VolumePath(const std::string &word)
 {

@@ -68,7 +68,7 @@ bool IsMounted(const std::string &volume);
 
 // For completion.
 std::vector<std::string> ServiceNames();
-std::vector<std::string> MountedVolumes();
+std::vector<std::string> VolumePaths();  // of those that are mounted
 
 }  // namespace tavoctl
 
