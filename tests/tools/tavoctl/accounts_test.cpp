@@ -1,17 +1,23 @@
 // tavoctl user, group and quota: what becomes of the files, and what is refused before anything does.
 #include "run_tavoctl.h"
 
+#include "support/eventually.h"
 #include "support/scratch_dir.h"
 
 #include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
 
+#include <csignal>
+#include <cstring>
 #include <filesystem>
 #include <sstream>
 
 #include <crypt.h>
 #include <sys/inotify.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+#include <utmpx.h>
 
 namespace {
 
@@ -215,6 +221,7 @@ TEST_F(TavoctlAccounts, WhatIsRefusedChangesNothing)
         {{"user", "delete", "--yes", "anna", "nemo"}, 3, "ERR_NO_SUCH_USER"},
         {{"user", "delete", "--yes", "anna", "Admin", "--system"}, 1, "ERR_USER_DB_DELETE"},
         {{"user", "delete", "--yes", "anna", "guest"}, 2, "--system"},
+        {{"group", "delete", "--yes", "users", "--system"}, 2, "the primary group of"},
         {{"group", "add", "sixteen letters!"}, 2, "ERR_INVALID_GROUPNAME"},
         {{"group", "add", "Users"}, 1, "ERR_GROUP_EXISTS"},
         {{"group", "add", "staff", "--members", "anna,nemo"}, 3, "nemo"},
@@ -233,6 +240,58 @@ TEST_F(TavoctlAccounts, WhatIsRefusedChangesNothing)
         EXPECT_EQ(ran.out, "");
         EXPECT_EQ(AccountFiles(), before) << testing::PrintToString(refusal.words);
     }
+}
+
+// A process of berta's, and then a session that the system has recorded.
+TEST_F(TavoctlAccounts, UsersWhoAreAtWorkAreDeletedByForceOnly)
+{
+    if (test::RootLacks("uids"))
+        GTEST_SKIP() << "nobody else to become";
+    const Words remove = {"user", "delete", "--yes", "anna", "berta"};
+    const pid_t pid = ::fork();
+    if (pid == 0) {
+        if (::setuid(2000) == 0)
+            ::pause();
+        ::_exit(1);
+    }
+    test::Ran ran = {};
+    EXPECT_TRUE(test::Eventually([&] {
+        return (ran = Tavoctl({"user", "delete", "--dry-run", "berta"})).status == 4;
+    }));
+    EXPECT_THAT(ran.err, AllOf(HasSubstr("running the process " + std::to_string(pid)), HasSubstr("--force")));
+    EXPECT_EQ(Tavoctl(remove).status, 4);
+    EXPECT_NE(Line(passwd, "anna"), "");
+    EXPECT_NE(Line(passwd, "berta"), "");
+    ::kill(pid, SIGKILL);
+    ::waitpid(pid, nullptr, 0);
+
+    utmpx session = {};
+    session.ut_type = USER_PROCESS;
+    session.ut_pid = ::getpid();
+    std::strcpy(session.ut_user, "berta");
+    std::strcpy(session.ut_line, "pts/7");
+    const auto record = [&] {
+        WriteFile("/var/run/utmp", std::string(reinterpret_cast<char *>(&session), sizeof session));
+    };
+    record();
+    ran = Tavoctl(remove);
+    EXPECT_EQ(ran.status, 4) << ran;
+    EXPECT_THAT(ran.err, HasSubstr("logged in at pts/7"));
+    session.ut_pid = pid;  // which has ended
+    record();
+    EXPECT_EQ(Tavoctl({"user", "delete", "--dry-run", "anna", "berta"}).status, 0);
+    session.ut_pid = ::getpid();
+    record();
+    ExpectDone({"user", "delete", "--yes", "--force", "anna", "berta"});
+    EXPECT_EQ(Line(passwd, "anna") + Line(passwd, "berta"), "");
+
+    ExpectDone({"group", "add", "staff", "--gid", "70000"});
+    ExpectDone({"user", "add", "carla", "--empty-password", "--gid", "70000"});
+    ran = Tavoctl({"group", "delete", "--yes", "staff"});
+    EXPECT_EQ(ran.status, 2) << ran;
+    EXPECT_THAT(ran.err, HasSubstr("the primary group of carla"));
+    ExpectDone({"group", "delete", "--yes", "--force", "staff"});
+    EXPECT_EQ(Line(groups, "staff"), "");
 }
 
 TEST_F(TavoctlAccounts, NamesThatMislead)

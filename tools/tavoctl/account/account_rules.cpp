@@ -12,6 +12,16 @@
 
 namespace tavoctl {
 
+constexpr std::size_t named_at_most = 5;
+
+std::string SomeOf(const std::vector<std::string> &names)
+{
+    std::string text;
+    for (std::size_t i = 0; i < names.size() && i < named_at_most; ++i)
+        text += (i ? ", " : "") + names[i];
+    return names.size() > named_at_most ? text + ", ..." : text;
+}
+
 void WarnOfName(const std::string &name)
 {
     if (name.find_first_not_of("0123456789") == std::string::npos)

@@ -7,6 +7,9 @@
 
 namespace tavoctl {
 
+// The first few of the names, with commas between them.
+std::string SomeOf(const std::vector<std::string> &names);
+
 // Digits only, blanks, and characters that may look like others.
 void WarnOfName(const std::string &name);
 

@@ -55,6 +55,7 @@ Action AccountDelete(Arguments &in)
 {
     const auto names = in.Texts("NAME", Kind::kind, Kind::name_help);
     const auto system = in.Flag("--system", std::string("also a ") + Kind::noun + " that the system needs");
+    const auto force = in.Flag("--force", Kind::force_help);
     return [=](Call &call) {
         std::string list;
         for (const std::string &name : *names) {
@@ -63,6 +64,8 @@ Action AccountDelete(Arguments &in)
             if (Kind::IsSystem(record) && !*system)
                 throw UsageFailure(attempted, "the system needs it", "say --system to do it");
             Kind::RefuseDelete(record, attempted);
+            if (!*force)
+                Kind::RefuseUsed(record, attempted);
             list += (list.empty() ? "" : ", ") + record.name;
             call.Compare(std::string(Kind::noun) + " " + record.name, Kind::columns, std::optional(record),
                          std::optional<typename Kind::Record>());

@@ -1,5 +1,6 @@
 // tavoctl group: local groups.
 #include "account/account_check.h"
+#include "account/account_use.h"
 #include "account/account_verbs.h"
 #include "account/group_record.h"
 #include "account/user_record.h"
@@ -25,6 +26,7 @@ struct GroupKind {
     static constexpr char noun[] = "group";
     static constexpr char name_help[] = "the group, in any case";
     static constexpr char delete_warning[] = "";
+    static constexpr char force_help[] = "also the primary group of a user";
     static constexpr bool guards_names = true;
     static constexpr int exists_code = ERR_GROUP_EXISTS;
     static constexpr const auto &columns = group_columns;
@@ -49,6 +51,11 @@ struct GroupKind {
     static Group Read(const std::string &name) { return ReadGroup(name); }
     static bool IsSystem(const Group &group) { return IsSystemGroup(group); }
     static void RefuseDelete(const Group &, const std::string &) {}
+    static void RefuseUsed(const Group &group, const std::string &attempted)
+    {
+        if (const std::string users = UsersWithPrimaryGroup(Id(group.gid)); !users.empty())
+            throw UsageFailure(attempted, "it is the primary group of " + users, "say --force to do it");
+    }
     static void RefuseId(const std::string &name, int gid) { RefuseTakenGroupId(name, gid); }
     static void Set(const std::string &old_name, const Group &group, const std::string &attempted)
     {
@@ -246,7 +253,7 @@ and of Samba.
 tavoctl group rename staff team)",
               AccountRename<GroupKind>);
     group.Add("delete", changes | destroys, Answer::Change(), R"(Deletes groups, also from the lists of shared folders,
-all in one batch. Their members stay. Nothing is done when one of them is not there.
+all in one batch. Their members stay. Nothing is done when one of them is not there, or is the primary group of a user.
 
 tavoctl group delete staff
 tavoctl group delete --yes staff guests)",

@@ -1,5 +1,6 @@
 // tavoctl user: local users.
 #include "account/account_check.h"
+#include "account/account_use.h"
 #include "account/user_verbs.h"
 #include "families.h"
 #include "frame/held_locks.h"
@@ -26,6 +27,12 @@ void UserKind::RefuseDelete(const User &user, const std::string &attempted)
 {
     if (::strcasecmp(user.name.c_str(), "root") == 0 || ::strcasecmp(user.name.c_str(), "admin") == 0)
         throw Failure{.attempted = attempted, .hint = "it must stay", .code = ERR_USER_DB_DELETE};
+}
+
+void UserKind::RefuseUsed(const User &user, const std::string &attempted)
+{
+    if (const std::string use = UseOfUser(user.name, Id(user.uid)); !use.empty())
+        throw BusyFailure(attempted, "the user is " + use, "say --force to do it");
 }
 
 namespace {
@@ -107,7 +114,7 @@ tavoctl user rename anna anna.berg)",
              AccountRename<UserKind>);
     user.Add("delete", changes | destroys, Answer::Change(),
              R"(Deletes accounts with their quotas, group memberships and
-home folders, all in one batch. Nothing is done when one of them is not there.
+home folders, all in one batch. Nothing is done when one of them is not there, is logged in or has processes.
 
 tavoctl user delete anna
 tavoctl user delete --yes anna berta carla)",

@@ -1,6 +1,7 @@
 // A user as tavoctl handles one.
 #include "account/user_record.h"
 
+#include "account/account_rules.h"
 #include "frame/containers.h"
 #include "frame/error_codes.h"
 #include "frame/failure.h"
@@ -18,7 +19,6 @@
 namespace tavoctl {
 namespace {
 
-constexpr std::size_t named_at_most = 5;
 constexpr time_t day_seconds = 86400;
 
 char *Pointer(const std::string &text)
@@ -75,14 +75,6 @@ bool IsDone(const UserChange &change)
     return SameTexts(*now, wanted) && (wanted.uid < 0 || now->uid == wanted.uid) &&
            (wanted.gid < 0 || now->gid == wanted.gid) && std::max(now->expires, -1) == std::max(wanted.expires, -1) &&
            now->cannot_change_password == wanted.cannot_change_password;
-}
-
-std::string SomeOf(const std::vector<std::string> &names)
-{
-    std::string text;
-    for (std::size_t i = 0; i < names.size() && i < named_at_most; ++i)
-        text += (i ? ", " : "") + names[i];
-    return names.size() > named_at_most ? text + ", ..." : text;
 }
 
 }  // namespace

@@ -14,6 +14,7 @@ struct UserKind {
     static constexpr char noun[] = "user";
     static constexpr const char *name_help = user_help;
     static constexpr char delete_warning[] = ", with home folders";
+    static constexpr char force_help[] = "also a user who is logged in or has processes";
     static constexpr bool guards_names = false;
     static constexpr int exists_code = ERR_USER_EXISTS;
     static constexpr const auto &columns = user_columns;
@@ -26,6 +27,7 @@ struct UserKind {
     static User Read(const std::string &name) { return ReadUser(name); }
     static bool IsSystem(const User &user) { return IsSystemUser(user); }
     static void RefuseDelete(const User &user, const std::string &attempted);
+    static void RefuseUsed(const User &user, const std::string &attempted);
     static void RefuseId(const std::string &name, int uid) { RefuseTakenId(name, uid); }
     static void Set(const std::string &old_name, const User &user, const std::string &attempted)
     {

@@ -1,0 +1,97 @@
+// What on the appliance still uses an account or a group.
+#include "account/account_use.h"
+
+#include "account/account_check.h"
+#include "account/account_rules.h"
+#include "frame/folder_names.h"
+#include "frame/processes.h"
+
+#include <cerrno>
+#include <charconv>
+#include <csignal>
+#include <cstring>
+#include <fstream>
+#include <sstream>
+#include <vector>
+
+#include <strings.h>
+#include <utmpx.h>
+
+namespace tavoctl {
+namespace {
+
+// The terminal of a session; empty without one. A session whose process has ended without a word is none.
+std::string SessionOf(const std::string &name)
+{
+    std::string terminal;
+    ::setutxent();
+    while (const utmpx *entry = ::getutxent()) {
+        const std::string user(entry->ut_user, ::strnlen(entry->ut_user, sizeof entry->ut_user));
+        const bool lives = ::kill(entry->ut_pid, 0) == 0 || errno == EPERM;
+        // A longer name is cut off there.
+        const bool same = ::strcasecmp(user.c_str(), name.substr(0, sizeof entry->ut_user).c_str()) == 0;
+        if (entry->ut_type == USER_PROCESS && same && lives) {
+            terminal.assign(entry->ut_line, ::strnlen(entry->ut_line, sizeof entry->ut_line));
+            break;
+        }
+    }
+    ::endutxent();
+    return terminal;
+}
+
+// Whether one of the process's user ids is this one: real, effective, saved, or of its file accesses.
+bool RunsAs(pid_t pid, uid_t uid)
+{
+    std::ifstream in("/proc/" + std::to_string(pid) + "/status");
+    for (std::string line; std::getline(in, line);) {
+        if (!line.starts_with("Uid:"))
+            continue;
+        std::istringstream ids(line.substr(std::strlen("Uid:")));
+        for (uid_t id = 0; ids >> id;)
+            if (id == uid)
+                return true;
+        return false;
+    }
+    return false;
+}
+
+std::vector<pid_t> ProcessesOf(uid_t uid)
+{
+    std::vector<pid_t> found;
+    for (const std::string &name : FolderNames("/proc")) {
+        pid_t pid = 0;
+        const auto [stop, error] = std::from_chars(name.data(), name.data() + name.size(), pid);
+        if (error == std::errc() && stop == name.data() + name.size() && RunsAs(pid, uid) && !CommandLine(pid).empty())
+            found.push_back(pid);
+    }
+    return found;
+}
+
+}  // namespace
+
+std::string UseOfUser(const std::string &name, uid_t uid)
+{
+    if (const std::string terminal = SessionOf(name); !terminal.empty())
+        return "logged in at " + terminal;
+    const std::vector<pid_t> pids = ProcessesOf(uid);
+    if (pids.empty())
+        return {};
+    const std::string first = std::to_string(pids.front()) + " (" + CommandLine(pids.front()) + ")";
+    return pids.size() == 1 ? "running the process " + first
+                            : "running " + std::to_string(pids.size()) + " processes, the first is " + first;
+}
+
+std::string UsersWithPrimaryGroup(gid_t gid)
+{
+    constexpr std::size_t gid_field = 3;
+    std::vector<std::string> names;
+    std::ifstream in("/etc/passwd");
+    for (std::string line; std::getline(in, line);) {
+        const std::vector<std::string> fields = SplitFields(line);
+        if (fields.size() > gid_field && fields[gid_field] == std::to_string(gid))
+            names.push_back(fields[0]);
+    }
+    return SomeOf(names);
+}
+
+}  // namespace tavoctl
