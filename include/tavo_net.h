@@ -102,7 +102,8 @@ TAVO_API int ErrTLIBSubnetToIpMask(char *szIn, char *szOut);
  */
 
 /* Reads the first wired interface, from its file and the kernel (/sys/class/net). Returns 0 (with empty addresses when
- * it has none), or -1 with *pCard untouched and ERR_BAD_PARAMETERS (NULL) or ERR_FILE_NOT_FOUND (no interface).
+ * it has none), or -1 with *pCard untouched and ERR_BAD_PARAMETERS (NULL), ERR_FILE_NOT_FOUND (no interface) or
+ * ERR_READ_FAILED (the kernel does not say which there are).
  * Files: /etc/sysconfig/network-scripts, /etc/sysconfig/network, /sys/class/net */
 TAVO_API int TAVONetGetCard1(TAVONETCARD *pCard);
 
@@ -128,8 +129,8 @@ TAVO_API int TAVONetGetCard(const char *szInterface, TAVONETCARD *pCard);
  * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetSetCard1(const TAVONETCARD *pCard, const TAVONETCARD *pPrevious);
 
-/* 1 when the file of the interface says BOOTPROTO=dhcp, else 0; a file without the key gets BOOTPROTO=static. Holds the
- * network lock shared (0x105, at most 5 s); when it cannot be had the answer is 0.
+/* 1 when the file of the interface says BOOTPROTO=dhcp, else 0; a file without the key gets BOOTPROTO=static, one that
+ * cannot be read stays. Holds the network lock shared (0x105, at most 5 s); when it cannot be had the answer is 0.
  * Files: /etc/sysconfig/network-scripts
  * Locks: TAVO_LOCK_HOST (shared, at most 5 s) */
 TAVO_API int BlTAVOLnxIsDHCP(const char *szInterface);

@@ -6,6 +6,7 @@
 #include "network/detail/interface_name.h"
 #include "network/detail/kernel_interface.h"
 #include "network/detail/net_command.h"
+#include "tavo_error.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -28,24 +29,43 @@ std::string SavedFile(const std::string &interface)
 bool Exists(const std::string &path)
 {
     struct stat st;
-    return ::lstat(path.c_str(), &st) == 0;
+    return ::lstat(path.c_str(), &st) == 0 || errno != ENOENT;
 }
 
-std::string Master(const std::string &interface)
-{
-    return ReadSetting(InterfaceFile(interface), "MASTER");
-}
+// Reads for one change. What is made of a file that could not be read would lack its lines, so the change is given up.
+class OldFiles {
+  public:
+    std::string Setting(const std::string &file, const char *key) { return Note(TryReadSetting(file, key)); }
 
-bool HasCopyToRestore(const std::string &interface)
-{
-    return Exists(SavedFile(interface)) && (!HasInterfaceFile(interface) || !Master(interface).empty());
-}
+    std::string Text(const std::string &file)
+    {
+        auto text = ReadKernelFile(file.c_str());
+        return !text && errno == ENOENT ? "" : Note(std::move(text));
+    }
 
-// The file that describes the interface outside of any bond.
-std::string PlainFile(const std::string &interface)
-{
-    return HasCopyToRestore(interface) ? SavedFile(interface) : InterfaceFile(interface);
-}
+    bool HasCopyToRestore(const std::string &interface)
+    {
+        return Exists(SavedFile(interface)) &&
+               (!HasInterfaceFile(interface) || !Setting(InterfaceFile(interface), "MASTER").empty());
+    }
+
+    // The file that describes the interface outside of any bond.
+    std::string PlainFile(const std::string &interface)
+    {
+        return HasCopyToRestore(interface) ? SavedFile(interface) : InterfaceFile(interface);
+    }
+
+    bool AreRead() const { return read_; }
+
+  private:
+    std::string Note(std::optional<std::string> text)
+    {
+        read_ = read_ && text;
+        return text.value_or("");
+    }
+
+    bool read_ = true;
+};
 
 bool SyncPath(const char *path, int flags)
 {
@@ -66,22 +86,22 @@ bool RestoreMember(const std::string &member)
     return RunNetCommand("/bin/mv -f %s.saved %s", file, file) == 0;
 }
 
-std::string BondText(const std::string &bond, BondMode mode, const std::string &first_member)
+std::string BondText(OldFiles &old, const std::string &bond, BondMode mode, const std::string &first_member)
 {
     const std::string file = InterfaceFile(bond);
     std::vector<SettingChange> changes = {
         {"DEVICE", bond}, {"ONBOOT", "yes"}, {"USERCTL", "no"}, {"BONDING_OPTS", std::string(BondOptions(mode))}};
     // A bond that is only changed may have got an address of its own since it was made.
-    if (ReadSetting(file, "BOOTPROTO").empty()) {
+    if (old.Setting(file, "BOOTPROTO").empty()) {
         for (const char *key : kAddressKeys) {
-            if (std::string value = ReadSetting(PlainFile(first_member), key); !value.empty())
+            if (std::string value = old.Setting(old.PlainFile(first_member), key); !value.empty())
                 changes.push_back({key, std::move(value)});
         }
     }
-    return EditSettings(ReadKernelFile(file.c_str()).value_or(""), changes);
+    return EditSettings(old.Text(file), changes);
 }
 
-std::string MemberText(const std::string &bond, const std::string &member)
+std::string MemberText(OldFiles &old, const std::string &bond, const std::string &member)
 {
     std::vector<SettingChange> changes = {
         {"DEVICE", member}, {"ONBOOT", "yes"}, {"MASTER", bond}, {"SLAVE", "yes"}, {"BOOTPROTO", "none"}};
@@ -89,18 +109,18 @@ std::string MemberText(const std::string &bond, const std::string &member)
         if (std::string_view(key) != "BOOTPROTO")
             changes.push_back({key, std::nullopt});
     }
-    return EditSettings(ReadKernelFile(PlainFile(member).c_str()).value_or(""), changes);
+    return EditSettings(old.Text(old.PlainFile(member)), changes);
 }
 
 // Of a member whose copy is lost: any address will do but none.
-std::string PlainText(const std::string &member)
+std::string PlainText(OldFiles &old, const std::string &member)
 {
     const SettingChange changes[] = {{"DEVICE", member},
                                      {"ONBOOT", "yes"},
                                      {"BOOTPROTO", "dhcp"},
                                      {"MASTER", std::nullopt},
                                      {"SLAVE", std::nullopt}};
-    return EditSettings(ReadKernelFile(InterfaceFile(member).c_str()).value_or(""), changes);
+    return EditSettings(old.Text(InterfaceFile(member)), changes);
 }
 
 }  // namespace
@@ -110,20 +130,24 @@ bool HasInterfaceFile(const std::string &interface)
     return Exists(InterfaceFile(interface));
 }
 
-std::vector<std::string> MembersOnFile(const std::string &bond)
+std::optional<std::vector<std::string>> MembersOnFile(const std::string &bond)
 {
     constexpr std::string_view stem = "ifcfg-";
+    const auto names = FolderNames(kInterfaceFolder);
+    if (!names)
+        return std::nullopt;
     std::vector<std::string> members;
-    for (const std::string &file : FolderNames(kInterfaceFolder)) {
+    OldFiles files;
+    for (const std::string &file : *names) {
         if (!file.starts_with(stem) || file.ends_with(".saved"))
             continue;
         std::string interface = file.substr(stem.size());
         // A file's own name for its interface tells it from the temporary ones that a crash leaves.
-        if (IsInterfaceName(interface) && Master(interface) == bond &&
-            ReadSetting(InterfaceFile(interface), "DEVICE") == interface)
+        if (IsInterfaceName(interface) && files.Setting(InterfaceFile(interface), "MASTER") == bond &&
+            files.Setting(InterfaceFile(interface), "DEVICE") == interface)
             members.push_back(std::move(interface));
     }
-    return members;
+    return files.AreRead() ? std::optional(std::move(members)) : std::nullopt;
 }
 
 bool BondChange::PrepareFile(NewFile &file, const std::string &interface, const std::string &text)
@@ -135,35 +159,42 @@ bool BondChange::PrepareFile(NewFile &file, const std::string &interface, const 
            ::fchmod(file.temp.Descriptor(), mode) == 0 && SyncFd(file.temp.Descriptor()) && file.temp.Close();
 }
 
-bool BondChange::Prepare(const std::string &bond, BondMode mode, const std::vector<std::string> &members)
+int BondChange::Prepare(const std::string &bond, BondMode mode, const std::vector<std::string> &members)
 {
     bond_ = bond;
+    const auto on_file = MembersOnFile(bond);
+    if (!on_file)
+        return ERR_READ_FAILED;
+    OldFiles old;
     std::vector<std::string> plain = members;
-    const std::vector<std::string> old = MembersOnFile(bond);
-    plain.insert(plain.end(), old.begin(), old.end());
+    plain.insert(plain.end(), on_file->begin(), on_file->end());
     std::sort(plain.begin(), plain.end());
     plain.erase(std::unique(plain.begin(), plain.end()), plain.end());
-    std::copy_if(plain.begin(), plain.end(), std::back_inserter(restored_), HasCopyToRestore);
+    std::copy_if(plain.begin(), plain.end(), std::back_inserter(restored_),
+                 [&](const std::string &interface) { return old.HasCopyToRestore(interface); });
     if (mode != BondMode::none)
         members_ = members;
 
     // What neither gets its copy back nor joins the new bond, and cannot stay as it is.
     std::erase_if(plain, [&](const std::string &interface) {
-        return HasCopyToRestore(interface) || (HasInterfaceFile(interface) && Master(interface).empty()) ||
+        return old.HasCopyToRestore(interface) ||
+               (HasInterfaceFile(interface) && old.Setting(InterfaceFile(interface), "MASTER").empty()) ||
                std::find(members_.begin(), members_.end(), interface) != members_.end();
     });
 
     member_files_ = std::vector<NewFile>(members_.size() + plain.size());
     auto file = member_files_.begin();
     for (const std::string &member : members_) {
-        if (!PrepareFile(*file++, member, MemberText(bond, member)))
-            return false;
+        if (!PrepareFile(*file++, member, MemberText(old, bond, member)))
+            return ERR_WRITE_FAILED;
     }
     for (const std::string &interface : plain) {
-        if (!PrepareFile(*file++, interface, PlainText(interface)))
-            return false;
+        if (!PrepareFile(*file++, interface, PlainText(old, interface)))
+            return ERR_WRITE_FAILED;
     }
-    return members_.empty() || PrepareFile(bond_file_, bond, BondText(bond, mode, members_.front()));
+    if (!members_.empty() && !PrepareFile(bond_file_, bond, BondText(old, bond, mode, members_.front())))
+        return ERR_WRITE_FAILED;
+    return old.AreRead() ? 0 : ERR_READ_FAILED;
 }
 
 bool BondChange::Dissolve()

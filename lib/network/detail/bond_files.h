@@ -10,13 +10,14 @@
 #include "core/detail/file_rewrite.h"
 #include "network/detail/bonding.h"
 
+#include <optional>
 #include <string>
 #include <vector>
 
 namespace tavo {
 
-// The interfaces whose files say that they are members of the bond; in no order.
-std::vector<std::string> MembersOnFile(const std::string &bond);
+// The interfaces whose files say that they are members of the bond; in no order. Empty when a file cannot be read.
+std::optional<std::vector<std::string>> MembersOnFile(const std::string &bond);
 
 bool HasInterfaceFile(const std::string &interface);
 
@@ -25,7 +26,8 @@ class BondChange {
   public:
     // Writes all new files beside the old ones: what can fail for lack of room fails here, while the network still
     // runs. Mode none dissolves; `members` are then those that become plain interfaces even without a copy to restore.
-    bool Prepare(const std::string &bond, BondMode mode, const std::vector<std::string> &members);
+    // 0 or ERR_READ_FAILED, ERR_WRITE_FAILED: nothing has changed.
+    int Prepare(const std::string &bond, BondMode mode, const std::vector<std::string> &members);
 
     // Puts them in place. When it fails some of them are, and the caller puts the old ones back.
     bool Apply();

@@ -39,10 +39,13 @@ void PutAddress(TAVONETCARD &card, const InterfaceAddress &found)
 
 CardState ReadCard(int index, TAVONETCARD *card)
 {
+    std::memset(card, 0, sizeof *card);
     const auto interfaces = WiredInterfaces();
-    if (index < 0 || static_cast<size_t>(index) >= interfaces.size())
+    if (!interfaces)
+        return CardState::unreadable;
+    if (index < 0 || static_cast<size_t>(index) >= interfaces->size())
         return CardState::absent;
-    return ReadCard(interfaces[static_cast<size_t>(index)], card);
+    return ReadCard((*interfaces)[static_cast<size_t>(index)], card);
 }
 
 CardState ReadCard(const std::string &interface, TAVONETCARD *card)

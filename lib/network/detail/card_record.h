@@ -16,7 +16,8 @@ enum class CardState {
     unreadable,  // the kernel did not answer
 };
 
-// Reads the index-th wired interface, from 0, into *card; of one without an address all the rest is filled in.
+// Reads the index-th wired interface, from 0, into *card; of one without an address all the rest is filled in. Without a
+// name where the kernel does not say which interfaces there are.
 CardState ReadCard(int index, TAVONETCARD *card);
 
 // The same of any interface, also one that is a member of a bond.

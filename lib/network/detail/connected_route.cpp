@@ -59,7 +59,10 @@ bool TryRepair(const std::string &interface, bool dhcp)
     if (!text)
         return false;
     const auto routes = ParseRouteTable(*text).value_or(std::vector<Route>());
-    const std::vector<std::string> cards = WiredInterfaces();
+    const auto wired = WiredInterfaces();
+    if (!wired)
+        return false;
+    const std::vector<std::string> &cards = *wired;
     bool done = true;
     for (const std::string &card : cards)
         done = RepairConnected(routes, card) && done;

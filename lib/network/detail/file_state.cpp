@@ -15,10 +15,13 @@ namespace {
 
 constexpr std::string_view kStem = "ifcfg-";
 
-std::vector<std::string> InterfaceFiles()
+std::optional<std::vector<std::string>> InterfaceFiles()
 {
+    const auto names = FolderNames(kInterfaceFolder);
+    if (!names)
+        return std::nullopt;
     std::vector<std::string> paths;
-    for (const std::string &name : FolderNames(kInterfaceFolder)) {
+    for (const std::string &name : *names) {
         if (name.starts_with(kStem))
             paths.push_back(kInterfaceFolder + name);
     }
@@ -53,8 +56,11 @@ int PutBack(const FileState &file)
 
 std::optional<std::vector<FileState>> ReadInterfaceFiles()
 {
+    const auto paths = InterfaceFiles();
+    if (!paths)
+        return std::nullopt;
     std::vector<FileState> files;
-    for (const std::string &path : InterfaceFiles()) {
+    for (const std::string &path : *paths) {
         auto file = ReadFileState(path);
         if (!file)
             return std::nullopt;

@@ -28,11 +28,17 @@ bool IsManaged(std::string_view line, std::string_view old_name, std::string_vie
            (!old_name.empty() && field[1] == old_name);
 }
 
-std::string OwnAddress()
+// Empty when the kernel does not say: an address that is only not seen just now must not be taken from the name.
+std::optional<std::string> OwnAddress()
 {
-    for (const std::string &interface : WiredInterfaces()) {
+    const auto interfaces = WiredInterfaces();
+    if (!interfaces)
+        return std::nullopt;
+    for (const std::string &interface : *interfaces) {
         if (const auto found = AddressOf(interface))
             return found->address.Text();
+        if (errno != EADDRNOTAVAIL && errno != ENODEV)
+            return std::nullopt;
     }
     return kNoAddress;
 }
@@ -44,10 +50,13 @@ bool IsOneWord(std::string_view name)
            std::all_of(name.begin(), name.end(), [](char byte) { return byte > ' ' && byte < 0x7F && byte != '#'; });
 }
 
-std::string NewText(std::string_view text, std::string_view old_name)
+std::optional<std::string> NewText(std::string_view text, std::string_view old_name)
 {
-    const std::string name = OwnHostName();
-    return name.empty() ? std::string(text) : HostsWithName(text, old_name, name, OwnAddress());
+    const auto name = OwnHostName();
+    const auto address = OwnAddress();
+    if (!name || !address)
+        return std::nullopt;
+    return name->empty() ? std::string(text) : HostsWithName(text, old_name, *name, *address);
 }
 
 }  // namespace
@@ -66,9 +75,10 @@ std::string HostsWithName(std::string_view old_text, std::string_view old_name, 
     return text;
 }
 
-std::string OwnHostName()
+std::optional<std::string> OwnHostName()
 {
-    if (std::string stored = ReadSetting(kNetworkFile, "HOSTNAME"); IsOneWord(stored))
+    const auto stored = TryReadSetting(kNetworkFile, "HOSTNAME");
+    if (!stored || IsOneWord(*stored))
         return stored;
     char name[256] = "";
     ::gethostname(name, sizeof name - 1);
@@ -83,14 +93,19 @@ int UpdateHosts(std::string_view old_name)
         return code;
     if (!rewrite.IsMissing() && !rewrite.Read(text))
         return ERR_READ_FAILED;
-    const std::string edited = NewText(text, old_name);
-    return edited == text ? Code() : rewrite.Replace(edited, 0644);
+    const auto edited = NewText(text, old_name);
+    if (!edited)
+        return ERR_READ_FAILED;
+    return *edited == text ? Code() : rewrite.Replace(*edited, 0644);
 }
 
 bool AreHostsTrue()
 {
     const auto text = ReadKernelFile(kHostsFile);
-    return text ? NewText(*text, {}) == *text : errno != ENOENT;
+    if (!text)
+        return errno != ENOENT;
+    const auto edited = NewText(*text, {});
+    return !edited || *edited == *text;
 }
 
 }  // namespace tavo

@@ -2,6 +2,7 @@
 #ifndef TAVO_NETWORK_DETAIL_HOSTS_FILE_H
 #define TAVO_NETWORK_DETAIL_HOSTS_FILE_H
 
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -14,15 +15,15 @@ inline constexpr const char *kHostsFile = "/etc/hosts";
 std::string HostsWithName(std::string_view old_text, std::string_view old_name, std::string_view new_name,
                           std::string_view address);
 
-// The host name that is stored, or the kernel's where none is.
-std::string OwnHostName();
+// The host name that is stored, or the kernel's where none is. Empty when the file cannot be read.
+std::optional<std::string> OwnHostName();
 
 // Rewrites the file, by one rename, where it does not have the appliance's name at the address of the first wired card
-// that has one, or at 127.0.1.1 where none has. `old_name` is a name that the appliance had before. 0 or a code. The
-// caller holds the network lock.
+// that has one, or at 127.0.1.1 where none has. `old_name` is a name that the appliance had before. 0 or a code: where
+// name or address cannot be read the file stays. The caller holds the network lock.
 int UpdateHosts(std::string_view old_name = {});
 
-// Whether UpdateHosts would leave the file as it is; also where the file cannot be read.
+// Whether UpdateHosts would leave the file as it is; also where something cannot be read.
 bool AreHostsTrue();
 
 }  // namespace tavo

@@ -6,6 +6,7 @@
 #include "network/detail/folder_names.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <cstring>
 
 #include <arpa/inet.h>
@@ -19,9 +20,20 @@ namespace {
 constexpr const char *kClass = "/sys/class/net/";
 
 // An Ethernet device, a bond included, that is not the member of another one.
-bool IsWired(const std::string &interface)
+// Empty when the kernel does not say.
+std::optional<bool> IsWired(const std::string &interface)
 {
-    return InterfaceAttribute(interface, "type") == "1" && !OpenFd((kClass + interface + "/master").c_str(), O_PATH);
+    const auto is_absent = [] {
+        return errno == ENOENT || errno == ENOTDIR || errno == ENODEV;
+    };
+    const auto type = ReadKernelFile((kClass + interface + "/type").c_str());
+    if (!type)
+        return is_absent() ? std::optional(false) : std::nullopt;
+    if (type->substr(0, type->find('\n')) != "1")
+        return false;
+    if (OpenFd((kClass + interface + "/master").c_str(), O_PATH))
+        return false;
+    return is_absent() ? std::optional(true) : std::nullopt;
 }
 
 // By the letters, then by the number behind them.
@@ -49,14 +61,20 @@ std::optional<Ipv4> Ask(int socket, const std::string &interface, unsigned long 
 
 }  // namespace
 
-std::vector<std::string> WiredInterfaces()
+std::optional<std::vector<std::string>> WiredInterfaces()
 {
-    std::vector<std::string> names;
-    for (std::string &name : FolderNames(kClass)) {
-        if (IsWired(name))
-            names.push_back(std::move(name));
-    }
-    std::sort(names.begin(), names.end(), ComesBefore);
+    auto names = FolderNames(kClass);
+    if (!names)
+        return std::nullopt;
+    bool read = true;
+    std::erase_if(*names, [&](const std::string &name) {
+        const auto wired = IsWired(name);
+        read = read && wired.has_value();
+        return wired != true;
+    });
+    if (!read)
+        return std::nullopt;
+    std::sort(names->begin(), names->end(), ComesBefore);
     return names;
 }
 

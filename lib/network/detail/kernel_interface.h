@@ -11,8 +11,8 @@
 namespace tavo {
 
 // The wired interfaces that can have an address: Ethernet devices and bonds, without the members of a bond, in the
-// natural order of their names (eth2 before eth10).
-std::vector<std::string> WiredInterfaces();
+// natural order of their names (eth2 before eth10). Empty when one of them cannot be read.
+std::optional<std::vector<std::string>> WiredInterfaces();
 
 // The text of /sys/class/net/INTERFACE/ATTRIBUTE without its newline; empty when it cannot be read.
 std::string InterfaceAttribute(const std::string &interface, const char *attribute);

@@ -31,19 +31,22 @@ constexpr const char *kSettings = "/etc/tavoinfo.conf";
 constexpr const char *kFileStems[] = {"ifcfg-", "more-", "search"};
 constexpr const char *kKeyTails[] = {"_mtu", "_wol_options"};
 
-std::vector<std::string> Interfaces()
+// Empty when they cannot be read.
+std::optional<std::vector<std::string>> Interfaces()
 {
-    std::vector<std::string> names = FolderNames("/sys/class/net/");
-    std::erase_if(names, [](const std::string &name) { return InterfaceAttribute(name, "type") != "1"; });
-    std::sort(names.begin(), names.end());
+    auto names = FolderNames("/sys/class/net/");
+    if (!names)
+        return std::nullopt;
+    std::erase_if(*names, [](const std::string &name) { return InterfaceAttribute(name, "type") != "1"; });
+    std::sort(names->begin(), names->end());
     return names;
 }
 
 // Which interfaces there are, and which is a part of which.
-std::string StructureText()
+std::string StructureText(const std::vector<std::string> &interfaces)
 {
     std::string text;
-    for (const std::string &name : Interfaces())
+    for (const std::string &name : interfaces)
         text += name + " " + InterfaceAttribute(name, "iflink") + " " + InterfaceAttribute(name, "bonding/mode") + " " +
                 InterfaceAttribute(name, "bonding/slaves") + "\n";
     return text;
@@ -51,10 +54,12 @@ std::string StructureText()
 
 bool AddFolder(Checkpoint &all)
 {
-    const std::vector<std::string> names = FolderNames(kInterfaceFolder);
+    const auto names = FolderNames(kInterfaceFolder);
+    if (!names)
+        return false;
     for (const char *stem : kFileStems) {
         std::string there;
-        for (const std::string &name : names) {
+        for (const std::string &name : *names) {
             if (!name.starts_with(stem))
                 continue;
             if (!all.AddFile(kInterfaceFolder + name))
@@ -84,7 +89,10 @@ void AddSettings(Checkpoint &all)
 
 bool AddAll(Checkpoint &all)
 {
-    all.Add({UndoStep::structure, {}, StructureText(), {}});
+    const auto interfaces = Interfaces();
+    if (!interfaces)
+        return false;
+    all.Add({UndoStep::structure, {}, StructureText(*interfaces), {}});
     for (const char *path : {kNetworkFile, "/etc/resolv.conf", "/etc/hosts"}) {
         if (!all.AddFile(path))
             return false;
@@ -93,7 +101,7 @@ bool AddAll(Checkpoint &all)
         return false;
     AddSettings(all);
     all.AddHostName();
-    for (const std::string &interface : Interfaces())
+    for (const std::string &interface : *interfaces)
         all.AddLiveCard(interface);
     return true;
 }
@@ -138,9 +146,10 @@ void PutBackFiles(const std::vector<UndoStep> &steps)
 // What is as it was is not touched: the other cards of the appliance are in use.
 int PutBackAll(const std::vector<UndoStep> &steps)
 {
-    const bool stands = std::any_of(steps.begin(), steps.end(), [](const UndoStep &step) {
-        return step.kind == UndoStep::structure && step.value == StructureText();
-    });
+    const auto interfaces = Interfaces();
+    const bool stands = interfaces && std::any_of(steps.begin(), steps.end(), [&](const UndoStep &step) {
+                            return step.kind == UndoStep::structure && step.value == StructureText(*interfaces);
+                        });
     if (!stands)
         RunCommandQuietly("/etc/rc.network stop > /dev/null 2>&1");
     PutBackFiles(steps);

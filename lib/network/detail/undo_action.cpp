@@ -65,7 +65,7 @@ bool IsListed(std::string_view lines, std::string_view line)
 
 void RemoveOtherFiles(const UndoStep &step)
 {
-    for (const std::string &name : FolderNames(step.target.c_str())) {
+    for (const std::string &name : FolderNames(step.target.c_str()).value_or(std::vector<std::string>())) {
         if (name.starts_with(step.more) && !IsListed(step.value, name))
             ::unlink((step.target + name).c_str());
     }

@@ -10,9 +10,20 @@
 #include "network/detail/interface_name.h"
 #include "network/detail/network_change.h"
 
+#include <cerrno>
 #include <cstring>
 
+#include <sys/stat.h>
+
 namespace {
+
+// One that cannot be read just now may well say dhcp, and stays.
+bool LacksMode(const std::string &file, int code)
+{
+    struct stat st;
+    return code == ERR_KEY_NOT_FOUND || code == ERR_NOT_ENOUGH_MEMORY ||  // or its value is longer than any mode
+           (code == ERR_OPEN_FAILED && ::stat(file.c_str(), &st) != 0 && errno == ENOENT);
+}
 
 bool IsDhcp(const char *interface)
 {
@@ -27,7 +38,7 @@ bool IsDhcp(const char *interface)
         return std::strcmp(protocol, "dhcp") == 0;
     LogError("%s(%d) Get BOOTPROTO failed.(%X)", TLIBErrGet());
     // The start-up script needs the key: an interface without one stays down.
-    if (TLIBFileSetKeyValue(file.c_str(), "BOOTPROTO", "static", nullptr) < 0)
+    if (LacksMode(file, TLIBErrGet()) && TLIBFileSetKeyValue(file.c_str(), "BOOTPROTO", "static", nullptr) < 0)
         LogError("%s(%d) TLIBFileSetKeyValue(%s, BOOTPROTO, static) failed.(%X)", file, TLIBErrGet());
     return false;
 }

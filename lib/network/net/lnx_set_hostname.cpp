@@ -17,7 +17,9 @@ namespace {
 
 int SetName(const char *name)
 {
-    const std::string old_name = tavo::OwnHostName();
+    const auto old_name = tavo::OwnHostName();
+    if (!old_name)
+        return Fail(ERR_READ_FAILED);
     tavo::Checkpoint before;
     before.AddSetting(tavo::kNetworkFile, "HOSTNAME");
     before.AddFile(tavo::kHostsFile);
@@ -25,7 +27,7 @@ int SetName(const char *name)
     before.Begin();
     int code = TLIBFileSetKeyValue(tavo::kNetworkFile, "HOSTNAME", name, nullptr) < 0 ? TLIBErrGet() : 0;
     if (code == 0) {
-        code = tavo::UpdateHosts(old_name);
+        code = tavo::UpdateHosts(*old_name);
         if (code != 0)
             LogError("%s:%d Set %s error.", tavo::kHostsFile);
     }

@@ -12,6 +12,8 @@ extern "C" int TAVONetGetCard1(TAVONETCARD *pCard)
         TAVONETCARD card;
         if (tavo::ReadCard(0, &card) == tavo::CardState::absent)
             return Fail(ERR_FILE_NOT_FOUND);
+        if (!card.szInterface[0])
+            return Fail(ERR_READ_FAILED);
         *pCard = card;  // an interface that is down has a record, too: with empty addresses
         return 0;
     });

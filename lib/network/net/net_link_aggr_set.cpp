@@ -45,12 +45,14 @@ bool IsAsItIs(const TAVONETLINKAGGR &aggr)
     TAVONETLINKAGGR now;
     if (TAVONetLinkAggrGet(aggr.szBond, &now) != 0 || now.nMode != aggr.nMode || now.nMember != aggr.nMember)
         return false;
-    std::vector<std::string> on_file = tavo::MembersOnFile(aggr.szBond);
+    auto on_file = tavo::MembersOnFile(aggr.szBond);
+    if (!on_file)
+        return false;
     for (int i = 0; i < aggr.nMember; ++i) {
-        if (std::strcmp(now.rgszMember[i], aggr.rgszMember[i]) != 0 || std::erase(on_file, aggr.rgszMember[i]) != 1)
+        if (std::strcmp(now.rgszMember[i], aggr.rgszMember[i]) != 0 || std::erase(*on_file, aggr.rgszMember[i]) != 1)
             return false;
     }
-    return on_file.empty() && tavo::HasInterfaceFile(aggr.szBond) == (aggr.nMode != TAVO_NET_AGGR_NONE);
+    return on_file->empty() && tavo::HasInterfaceFile(aggr.szBond) == (aggr.nMode != TAVO_NET_AGGR_NONE);
 }
 
 // The name of something else that the kernel has, such as a card, whose file would be lost.
@@ -110,8 +112,9 @@ int Set(TAVONETLINKAGGR aggr)
         return Fail(ERR_READ_FAILED);
     const std::vector<std::string> members(aggr.rgszMember, aggr.rgszMember + aggr.nMember);
     tavo::BondChange change;
-    const bool prepared = change.Prepare(aggr.szBond, static_cast<tavo::BondMode>(aggr.nMode), members);
-    const int code = prepared ? Rebuild(change, before) : ERR_WRITE_FAILED;
+    int code = change.Prepare(aggr.szBond, static_cast<tavo::BondMode>(aggr.nMode), members);
+    if (code == 0)
+        code = Rebuild(change, before);
     if (code == ERR_WRITE_FAILED)
         LogError("%s:%d Set %s error.", tavo::InterfaceFile(aggr.szBond));
     return code == 0 ? 0 : Fail(code);

@@ -107,7 +107,7 @@ Family NetworkFamily()
     return {
         "Network",
         {
-            CALL(BlTAVOLnxIsDHCP, kAnswers | kSteps, { run(f, "eth0"); }),
+            CALL(BlTAVOLnxIsDHCP, kAnswers, { run(f, "eth0"); }),
             CALL(BlTAVONetIPv6IsEnabled, kAnswers, { run(f, "eth0"); }),
             CALL(BlTLIBIsAtom, kZeroFails | kNoCode, { run(f, "atom"); }),
             CALL(BlTLIBIsConnected, kAnswers, { run(f, "eth0"); }),
@@ -154,8 +154,8 @@ Family NetworkFamily()
                  }),
             CALL(TAVOLnxSetHostname, kInChild, { run(f, "tavo"); }),
             CALL(TAVONetAddressProbe, kAnswers | kNoFaults, { run(f, "eth0", "192.0.2.2", 1); }),
-            CALL(TAVONetCheckpointEnd, kAnswers | kSteps, { run(f); }),
-            CALL(TAVONetCheckpointPutBack, kAnswers | kSteps, { run(f); }),
+            CALL(TAVONetCheckpointEnd, kAnswers, { run(f); }),
+            CALL(TAVONetCheckpointPutBack, kAnswers, { run(f); }),
             CALL(TAVONetCheckpointTake, kAnswers | kSteps, { run(f); }),
             CALL(TAVONetDNSGet, 0,
                  {
@@ -184,7 +184,7 @@ Family NetworkFamily()
             CALL(TAVONetDefaultGatewaySet, 0, { run(f, "192.0.2.2"); }),
             CALL(TAVONetDhcp6Wait, kAnswers | kNoFaults, { run(f, "eth0", 0); }),
             CALL(TAVONetDhcpTest, 0, { run(f, "eth0", 1); }),
-            CALL(TAVONetHostsRefresh, kAnswers | kSteps, { run(f); }),
+            CALL(TAVONetHostsRefresh, kAnswers, { run(f); }),
             CALL(TAVONetGetCard, kAnswers,
                  {
                      TAVONETCARD card = {};
@@ -226,7 +226,7 @@ Family NetworkFamily()
                      Found found;
                      run(f, "bond0", &found.list);
                  }),
-            CALL(TAVONetLinkAggrSet, kAnswers | kSteps,
+            CALL(TAVONetLinkAggrSet, kAnswers,
                  {
                      const TAVONETLINKAGGR bond = Bond();
                      run(f, &bond);
