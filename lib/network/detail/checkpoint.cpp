@@ -89,8 +89,10 @@ void Checkpoint::End()
     if (!record_)
         return;
     noted_in = -1;
+    // One that cannot be removed would undo the change later: an empty one undoes nothing.
+    if (::unlink(kRecord) != 0)
+        (void)!::ftruncate(record_.Get(), 0);
     record_.Reset();
-    ::unlink(kRecord);
 }
 
 bool Checkpoint::PutBack(bool cleared)

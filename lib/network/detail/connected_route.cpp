@@ -15,8 +15,8 @@
 namespace tavo {
 namespace {
 
-// Each of these is false when a look or a command failed that may well succeed the next time. A command that the kernel
-// refuses is none of these: a gateway may be on no network of ours.
+// Each of these is false when a look or a command failed that may well succeed the next time. A gateway on no network of
+// ours is refused each time.
 bool RepairConnected(const std::vector<Route> &routes, const std::string &interface)
 {
     const auto found = AddressOf(interface);
@@ -29,9 +29,13 @@ bool RepairConnected(const std::vector<Route> &routes, const std::string &interf
     return present || RunRouteTool("add", Ipv4Route{Ipv4::FromWord(network), found->mask}, interface.c_str()) != -1;
 }
 
-bool AddDefault(const Ipv4 &gateway)
+bool AddDefault(const Ipv4 &gateway, const std::string &card)
 {
-    return RunNetCommand("/sbin/route add default gw %s > /dev/null 2>&1", gateway.Text()) != -1;
+    const int status = RunNetCommand("/sbin/route add default gw %s > /dev/null 2>&1", gateway.Text());
+    if (status <= 0)
+        return status == 0;
+    const auto own = AddressOf(card);
+    return !own || ((own->address.Word() ^ gateway.Word()) & own->mask.Word()) != 0;
 }
 
 bool RepairDefault(const std::vector<Route> &routes, const std::string &card, bool dhcp)
@@ -45,12 +49,12 @@ bool RepairDefault(const std::vector<Route> &routes, const std::string &card, bo
         const auto gateway = leased ? leased : stored;
         const bool there =
             std::any_of(routes.begin(), routes.end(), [](const Route &route) { return route.IsDefault(); });
-        return there || !gateway || AddDefault(*gateway);
+        return there || !gateway || AddDefault(*gateway, card);
     }
     const auto leads_there = [&](const Route &route) {
         return route.IsDefault() && route.gateway == *stored;
     };
-    return !stored || std::any_of(routes.begin(), routes.end(), leads_there) || AddDefault(*stored);
+    return !stored || std::any_of(routes.begin(), routes.end(), leads_there) || AddDefault(*stored, card);
 }
 
 bool TryRepair(const std::string &interface, bool dhcp)

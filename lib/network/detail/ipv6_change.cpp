@@ -23,7 +23,10 @@ int StoreAddress(Ipv6AddressChange change, const std::string &interface, const s
                                          {"IPV6PREFIXLENG", std::to_string(length)}};
         return RewriteSettings(file, changes);
     }
-    const auto stored = ParseIpv6(ReadSetting(file, "IPV6ADDR").c_str());
+    const auto setting = TryReadSetting(file, "IPV6ADDR");
+    if (!setting)
+        return ERR_READ_FAILED;
+    const auto stored = ParseIpv6(setting->c_str());
     if (!stored || Ipv6Text(*stored) != address)
         return 0;
     const SettingChange changes[] = {{"IPV6ADDR", std::nullopt}, {"IPV6PREFIXLENG", std::nullopt}};
@@ -38,7 +41,7 @@ int Change(Ipv6AddressChange change, const std::string &interface, const std::st
     before.AddIpv6Address(interface, address, length);
     before.Begin(where);
     if (RunNetCommand("/sbin/ip -6 addr %s %s/%d dev %s > /dev/null 2>&1", verb, address, length, interface) != 0) {
-        before.End();
+        before.PutBackAll();  // it may have been killed when its work was done
         return Fail(ERR_OP_FAILURE, where);
     }
     const int code = StoreAddress(change, interface, address, length);

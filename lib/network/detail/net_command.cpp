@@ -8,11 +8,11 @@
 
 namespace tavo {
 
-int RunNetText(const std::string &command)
+int RunNetText(const std::string &command, bool quietly)
 {
     const KeepChildStatus keep;
     Checkpoint::NoteCommand(0, "-", command);
-    const pid_t pid = StartCommand(command, kInherited, kInherited);
+    const pid_t pid = StartCommand(command, quietly ? kNullDevice : kInherited, quietly ? kNullDevice : kInherited);
     if (pid < 0)
         return -1;
     const std::string beginning = BeginningOf(pid);

@@ -112,10 +112,11 @@ struct LiveIpv6Route {
     std::string gateway;      // empty for a network on the link
 };
 
-// Without those that come and go with an address, and those of the link itself.
+// Without those that come and go with an address or with the link itself.
 std::vector<LiveIpv6Route> LiveIpv6Routes(const std::string &interface)
 {
     constexpr unsigned kernels_own = 0x80000000u | 0x00100000u;  // RTF_LOCAL, RTF_ANYCAST
+    constexpr std::string_view address_metric = "00000100";      // of the network that an address brings
     std::vector<LiveIpv6Route> found;
     // "DESTINATION LENGTH SOURCE LENGTH GATEWAY METRIC REFERENCES USES FLAGS INTERFACE", in hexadecimal
     const std::string table = ReadKernelFile("/proc/net/ipv6_route").value_or("");
@@ -127,7 +128,8 @@ std::vector<LiveIpv6Route> LiveIpv6Routes(const std::string &interface)
             continue;
         std::from_chars(field[8].data(), field[8].data() + field[8].size(), flags, 16);
         std::from_chars(field[1].data(), field[1].data() + field[1].size(), length, 16);
-        if ((flags & kernels_own) != 0 || field[0].starts_with("fe80") || field[0].starts_with("ff"))
+        if ((flags & kernels_own) != 0 || (!(flags & RTF_GATEWAY) && field[5] == address_metric) ||
+            field[0].starts_with("fe80") || field[0].starts_with("ff"))
             continue;
         found.push_back(
             {Ipv6OfHex(field[0]) + "/" + std::to_string(length), flags & RTF_GATEWAY ? Ipv6OfHex(field[4]) : ""});

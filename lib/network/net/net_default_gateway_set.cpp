@@ -6,12 +6,24 @@
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "network/detail/checkpoint.h"
+#include "network/detail/connected_route.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/ipv4_text.h"
 #include "network/detail/net_command.h"
 #include "network/detail/network_change.h"
 
+#include <algorithm>
+
 namespace {
+
+// To any router when `gateway` is NULL.
+bool HasDefault(const tavo::Ipv4 *gateway = nullptr)
+{
+    const auto routes = tavo::LiveRoutes();
+    return std::any_of(routes.begin(), routes.end(), [&](const tavo::Route &route) {
+        return route.IsDefault() && (!gateway || route.gateway == *gateway);
+    });
+}
 
 int SetGateway(const std::string &gateway)
 {
@@ -20,7 +32,8 @@ int SetGateway(const std::string &gateway)
     before.AddGateway();
     before.Begin();
     // There may be none to delete. But one that is still there would stay beside the new one.
-    if (tavo::RunNetCommand("/sbin/route delete default > /dev/null 2>&1") == -1) {
+    const int deleted = tavo::RunNetCommand("/sbin/route delete default > /dev/null 2>&1");
+    if (deleted == -1 || (deleted != 0 && HasDefault())) {
         before.PutBackAll();
         return Fail(ERR_OP_FAILURE);
     }
@@ -33,7 +46,8 @@ int SetGateway(const std::string &gateway)
     if (const int status = tavo::RunNetCommand("/sbin/route add default gw %s > /dev/null 2>&1", gateway)) {
         LogError("%s(%d): failed to set default gateway.");
         // Without a route the appliance would be cut off from whoever sets it.
-        if (status == -1)
+        const auto added = tavo::ParseIpv4(gateway);
+        if (status == -1 || HasDefault(&*added))
             before.PutBackAll();
         else
             before.PutBack();

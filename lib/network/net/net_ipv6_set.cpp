@@ -21,8 +21,8 @@ int SwitchIpv6(const char *interface, bool on)
     // Quietly: the shell itself complains of an interface that is not there.
     const auto command =
         tavo::ShellCommand("/bin/echo %d > %s%s%s", on ? 0 : 1, "/proc/sys/net/ipv6/conf/", interface, "/disable_ipv6");
-    if (!command || tavo::RunCommandQuietly(*command) != 0) {
-        before.End();
+    if (!command || tavo::RunNetText(*command, true) != 0) {
+        before.PutBackAll();  // it may have been killed when its work was done
         return Fail(ERR_OP_FAILURE);
     }
     const tavo::SettingChange changes[] = {{"DEVICE", interface}, {"IPV6INIT", on ? "yes" : "no"}};

@@ -16,12 +16,13 @@ int SetBoth(const char *interface, int mtu)
     before.AddMtu(interface);
     before.AddSetting("/etc/tavoinfo.conf", tavo::MtuKey(interface).text);
     before.Begin();
-    const bool set = TAVONetSetMTUEth(interface, mtu) == 0;
-    const bool stored = set && TAVOConfSetMTUValue(interface, mtu) == 0;
-    if (set && !stored)
+    // Also when the command failed: it may have been killed when its work was done.
+    if (TAVONetSetMTUEth(interface, mtu) != 0 || TAVOConfSetMTUValue(interface, mtu) != 0) {
         before.PutBack();
+        return -1;
+    }
     before.End();
-    return stored ? 0 : -1;
+    return 0;
 }
 
 }  // namespace

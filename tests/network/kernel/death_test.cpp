@@ -1,63 +1,106 @@
-// A program that dies in the middle of a change: the next one finds the network as it was or as it was asked for, in the
-// kernel and in the files, and a default route in both.
+// Changes of the network that do not get to their end: the program dies in the middle, a system call fails, a command
+// fails. The network is as it was or as it was asked for then, in the kernel and in the files, and has a default route.
 #include "tavo_net.h"
 
 #include "network/card_record.h"
 #include "support/container_text.h"
 #include "support/fault_state.h"
+#include "support/network_scene.h"
 #include "support/rounds.h"
-#include "support/scenario.h"
-#include "support/scratch_dir.h"
 #include "support/traced_call.h"
-#include "support/virtual_cable.h"
 
 #include <gmock/gmock.h>
 
 #include <algorithm>
+#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <functional>
+#include <iterator>
 #include <optional>
+#include <ostream>
+#include <sstream>
 
+#include <sys/mount.h>
 #include <sys/utsname.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
 using test::Card;
+using test::kIfcfg;
 using test::Node;
 using test::ReadFile;
-using test::VirtualCable;
+using test::ShellStatus;
 using test::WriteFile;
 
 namespace {
 
 constexpr const char *kRecord = "/etc/network.undo";
-constexpr const char *kIfcfg = "/etc/sysconfig/network-scripts/ifcfg-eth0";
+constexpr const char *kScripts = "/etc/sysconfig/network-scripts";
 
 std::string Text(const char *path)
 {
     return std::filesystem::exists(path) ? ReadFile(path) : "none";
 }
 
+// Without the temporary ones that a death leaves: a dot and six characters at the end.
+std::string InterfaceFiles()
+{
+    std::vector<std::string> files;
+    for (const auto &entry : std::filesystem::directory_iterator(kScripts)) {
+        if (entry.path().extension().string().size() != 7)
+            files.push_back(entry.path().string() + "\n" + ReadFile(entry.path()));
+    }
+    std::sort(files.begin(), files.end());
+    std::string text;
+    for (const std::string &file : files)
+        text += file;
+    return text;
+}
+
+std::vector<std::string> Fields(const std::string &line)
+{
+    std::istringstream words(line);
+    return {std::istream_iterator<std::string>(words), {}};
+}
+
+// Addresses and routes, without those that the kernel makes by itself.
+std::string IPv6State()
+{
+    std::string state = Text("/proc/sys/net/ipv6/conf/eth0/disable_ipv6");
+    const auto add = [&](const char *table, size_t fields, auto is_ours) {
+        std::istringstream lines(Text(table));
+        for (std::string line; std::getline(lines, line);) {
+            const auto field = Fields(line);
+            if (field.size() == fields && field.back() == "eth0" && !line.starts_with("f") && is_ours(field))
+                state += field[0] + "/" + field[fields == 6 ? 2 : 1] + " " + field[fields == 6 ? 3 : 4] + "\n";
+        }
+    };
+    add("/proc/net/if_inet6", 6, [](const auto &) { return true; });
+    add("/proc/net/ipv6_route", 10, [](const auto &field) {
+        return (std::stoul(field[8], nullptr, 16) & 0x80100000) == 0;  // local, anycast
+    });
+    return state;
+}
+
 // All that a change may leave half done.
 std::string State()
 {
-    std::string state;
-    for (const char *path : {kIfcfg, "/etc/sysconfig/network", "/etc/hosts", "/etc/resolv.conf", "/proc/net/route",
+    std::string state = InterfaceFiles() + IPv6State();
+    for (const char *path : {"/etc/sysconfig/network", "/etc/hosts", "/etc/resolv.conf", "/proc/net/route",
                              "/sys/class/net/eth0/mtu", "/etc/tavoinfo.conf"})
         state += std::string(path) + "\n" + Text(path);
-    const std::string addresses = Text("/proc/net/if_inet6");
-    state += addresses.find("20010db8") != std::string::npos ? "2001:db8\n" : "";
     utsname name;
     ::uname(&name);
     TAVONETCARD card = {};
     TAVONetGetCard1(&card);
-    return state + name.nodename + "\n" + card.szIp + "/" + card.szMask;
+    return state + name.nodename + "\n" + card.szInterface + " " + card.szIp + "/" + card.szMask;
 }
 
 bool HasDefaultRoute()
 {
-    return Text("/proc/net/route").find("\neth0\t00000000\t") != std::string::npos;
+    const std::string routes = Text("/proc/net/route");
+    return routes.find("\neth0\t00000000\t") != routes.npos || routes.find("\nbond0\t00000000\t") != routes.npos;
 }
 
 // What changes something outside of the process, or starts a program.
@@ -70,199 +113,372 @@ bool Matters(const test::SystemCall &call)
     return std::any_of(std::begin(names), std::end(names), [&](const char *name) { return call.Name() == name; });
 }
 
-class Death : public testing::Test {
-  protected:
-    void SetUp() override
-    {
-        if (const std::string missing = VirtualCable::Missing(); !missing.empty())
-            GTEST_SKIP() << missing;
-        if (!test::CanTrace())
-            GTEST_SKIP() << "no process may be traced here";
-        cable_.emplace("cable");
-        here_.emplace("here");
-        cable_->Plug(*here_, "eth0");
-        EXPECT_TRUE(here_->Run([] {
-            WriteFile("/etc/sysconfig/network", "GATEWAY=192.0.2.99\nHOSTNAME=here\n");
-            WriteFile(kIfcfg, "DEVICE=eth0\nONBOOT=yes\nBOOTPROTO=static\n");
-            const TAVONETCARD card = Card(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0");
-            EXPECT_EQ(TAVONetSetCard1(&card, nullptr), 0);
-            EXPECT_EQ(TAVONetDNSSet(test::MakeList({"192.0.2.53"}).get()), 0);
-            EXPECT_EQ(TAVONetSetMTUValue("eth0", 1500), 0);
-            return true;
-        }));
-    }
+// The shell of the library's commands: fails the command that /tmp/failing counts down to, before or after it was run.
+constexpr const char *kShell = R"(#!/tmp/sh
+if [ "$1" = -c ] && [ -f /tmp/failing ]; then
+    read -r left is_run </tmp/failing
+    echo "$((left - 1)) $is_run" >/tmp/failing
+    if [ "$left" = 1 ]; then
+        [ "$is_run" = 0 ] || /tmp/sh "$@"
+        exit 1
+    fi
+fi
+exec /tmp/sh "$@"
+)";
 
-    // At every system call that matters. `back` undoes the whole change.
-    void DieEverywhere(const std::function<int()> &change, const std::function<void()> &back)
-    {
-        EXPECT_TRUE(here_->Run([&] {
-            const std::string before = State();
-            EXPECT_TRUE(HasDefaultRoute());
-            const std::function<void()> work = [&] {
-                ::_exit(change() == 0 ? 0 : 1);
-            };
-            std::vector<int> indexes;
-            for (const test::SystemCall &call : test::SystemCallsOf(work)) {
-                if (Matters(call))
-                    indexes.push_back(call.index);
-            }
-            EXPECT_GT(indexes.size(), 10u);
-            const std::string asked = State();
-            EXPECT_NE(asked, before);
-            size_t as_before = 0;
-            for (size_t i = 0; i < indexes.size(); i += static_cast<size_t>(test::Stride())) {
-                back();
-                EXPECT_EQ(State(), before);
-                if (!test::DiesAtCall(indexes[i], work))
-                    break;
-                EXPECT_EQ(TAVONetHostsRefresh(), 0);
-                const std::string found = State();
-                EXPECT_TRUE(found == before || found == asked) << "call " << indexes[i] << "\n"
-                                                               << found << "\nbefore:\n"
-                                                               << before << "\nasked:\n"
-                                                               << asked;
-                EXPECT_TRUE(HasDefaultRoute()) << "call " << indexes[i];
-                EXPECT_FALSE(std::filesystem::exists(kRecord)) << "call " << indexes[i];
-                as_before += found == before;
-            }
-            EXPECT_GT(as_before, 0u);
-            return true;
-        }));
-    }
-
-    // One system call of the library's fails at each place. What is said of the result is true of the network.
-    void FailEverywhere(const std::function<int()> &change, const std::function<void()> &back)
-    {
-        EXPECT_TRUE(here_->Run([&] {
-            const std::string before = State();
-            const std::function<void()> work = [&] {
-                const int result = change();
-                ::_exit(result == 0 ? 0 : result == -2 ? 2 : 1);
-            };
-            const auto calls = test::DistinctCalls(test::SystemCallsOf(work));
-            EXPECT_GT(calls.size(), 20u);
-            const std::string asked = State();
-            size_t failed = 0;
-            for (size_t i = 0; i < calls.size(); i += static_cast<size_t>(test::Stride())) {
-                for (const int error : {EIO, ENOSPC}) {
-                    back();
-                    EXPECT_EQ(State(), before);
-                    const test::Ending ending = test::FailsAtCall(calls[i], error, work);
-                    EXPECT_FALSE(ending.hung) << calls[i].Name();
-                    const int status = WIFEXITED(ending.status) ? WEXITSTATUS(ending.status) : 128;
-                    EXPECT_LE(status, 2) << calls[i].Name() << " " << ending;
-                    EXPECT_TRUE(HasDefaultRoute()) << calls[i].Name() << " " << calls[i].index;
-                    EXPECT_EQ(TAVONetHostsRefresh(), 0);
-                    const std::string found = State();
-                    EXPECT_TRUE(status == 2 || found == before || found == asked)
-                        << calls[i].Name() << " " << calls[i].index << " status " << status << "\n"
-                        << found << "\nbefore:\n"
-                        << before << "\nasked:\n"
-                        << asked;
-                    failed += status == 1;
-                }
-            }
-            EXPECT_GT(failed, 0u);
-            return true;
-        }));
-    }
-
-    std::optional<VirtualCable> cable_;
-    std::optional<Node> here_;
-};
-
-TEST_F(Death, LeavesAnAddress)
-{
-    const auto set = [](const char *address) {
-        const TAVONETCARD card = Card(TAVO_NET_STATIC, address, "255.255.255.0");
-        return TAVONetSetCard1(&card, &card);
-    };
-    DieEverywhere([=] { return set("192.0.2.60"); }, [=] { EXPECT_EQ(set("192.0.2.20"), 0); });
-    EXPECT_TRUE(here_->Run([=] { return set("192.0.2.20") == 0; }));
-    FailEverywhere([=] { return set("192.0.2.60"); }, [=] { EXPECT_EQ(set("192.0.2.20"), 0); });
-}
-
-// A client that sets what it gets and goes to the background; /sbin/dhcpcd of the scenario.
+// Gets a lease at once and goes to the background.
 constexpr const char *kClient = R"(#!/bin/sh
 busybox ifconfig "$2" 192.0.2.40 netmask 255.255.255.0
 busybox route add default gw 192.0.2.98
 printf 'IPADDR=192.0.2.40\nNETMASK=255.255.255.0\nGATEWAY=192.0.2.98\n' >/etc/dhcpc/dhcpcd-"$2".info
 )";
 
-TEST_F(Death, LeavesAnAddressAlsoOnTheWayToDhcp)
+// A kernel without bonds: a bridge carries the members' packets as well. The start script runs this first.
+constexpr const char *kBondHook = R"(#!/bin/sh
+scripts=/etc/sysconfig/network-scripts
+case $1 in
+start)
+    [ -f $scripts/ifcfg-bond0 ] || exit 0
+    [ -d /sys/class/net/bond0 ] || ip link add bond0 type bridge
+    for name in eth0 eth1; do
+        ! grep -q '^MASTER=bond0' $scripts/ifcfg-$name || ip link set $name master bond0 up
+    done
+    ;;
+stop) ip link del bond0 2>/dev/null ;;
+esac
+exit 0
+)";
+
+int SetAddress(const char *address)
 {
-    const auto scripted = [](const char *tool) {
-        return std::string("#!/bin/sh\nexec /bin/busybox ") + tool + " \"$@\"\n";
-    };
-    test::Scenario scenario;
-    scenario.InAnyOrder();
-    scenario.ExpectAny("/sbin/ifconfig").AnyTimes().Runs(scripted("ifconfig"));
-    scenario.ExpectAny("/sbin/route").AnyTimes().Runs(scripted("route"));
-    scenario.ExpectAny("/sbin/dhcpcd").AnyTimes().Runs(kClient);
+    const TAVONETCARD card = Card(TAVO_NET_STATIC, address, "255.255.255.0");
+    return TAVONetSetCard1(&card, &card);
+}
+
+int SetDhcp()
+{
+    const TAVONETCARD card = Card(TAVO_NET_DHCP);
+    return TAVONetSetCard1(&card, &card);
+}
+
+void BackToStatic()
+{
+    ShellStatus("busybox ifconfig eth0 0.0.0.0");
+    WriteFile(kIfcfg, "DEVICE=eth0\nONBOOT=yes\nBOOTPROTO=static\nIPADDR=192.0.2.20\nNETMASK=255.255.255.0\n"
+                      "BROADCAST=192.0.2.255\nNETWORK=192.0.2.0\n");
+    EXPECT_EQ(SetAddress("192.0.2.20"), 0);
+}
+
+int SetServer(const char *server)
+{
+    return TAVONetDNSSet(test::MakeList({server}).get());
+}
+
+bool Shows(const char *command)
+{
+    return ShellStatus(command) == 0;
+}
+
+bool HasIPv6Address()
+{
+    return Shows("grep -q ^20010db8 /proc/net/if_inet6");
+}
+
+bool HasIPv6Route()
+{
+    return Shows("grep -q ^20010db800010000 /proc/net/ipv6_route");
+}
+
+int AddIPv6Address()
+{
+    return TAVONetIPv6AddrAdd("eth0", "2001:db8::20", 64);
+}
+
+int RemoveIPv6Address()
+{
+    return TAVONetIPv6AddrDel("eth0", "2001:db8::20", 64);
+}
+
+int AddIPv6Route()
+{
+    return TAVONetIPv6RouteAdd("eth0", "2001:db8:1::", 48, "2001:db8::1");
+}
+
+int RemoveIPv6Route()
+{
+    return TAVONetIPv6RouteDel("eth0", "2001:db8:1::", 48, "2001:db8::1");
+}
+
+void EnsureIPv6()
+{
+    EXPECT_EQ(TAVONetIPv6Set("eth0", 1), 0);
+    if (!HasIPv6Address()) {
+        EXPECT_EQ(AddIPv6Address(), 0);
+    }
+    if (!HasIPv6Route()) {
+        EXPECT_EQ(AddIPv6Route(), 0);
+    }
+}
+
+int MakeBond()
+{
+    TAVONETLINKAGGR bond = {};
+    std::strcpy(bond.szBond, "bond0");
+    bond.nMode = TAVO_NET_AGGR_BACKUP;
+    bond.nMember = 2;
+    std::strcpy(bond.rgszMember[0], "eth0");
+    std::strcpy(bond.rgszMember[1], "eth1");
+    return TAVONetLinkAggrSet(&bond);
+}
+
+void NoBond()
+{
+    EXPECT_EQ(ShellStatus("/etc/rc.network stop && cd /etc/sysconfig/network-scripts && rm -f * && "
+                          "printf 'DEVICE=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.20\nNETMASK=255.255.255.0\n' "
+                          ">ifcfg-eth0 && printf '# second\nDEVICE=eth1\nBOOTPROTO=none\n' >ifcfg-eth1 && "
+                          "/etc/rc.network start"),
+              0);
+}
+
+struct Change {
+    const char *name;
+    int (*make)();
+    void (*back)();  // from before the change or from after it
+    int stride = 1;  // of a short run
+    enum { nothing, ipv6, client } needs = nothing;
+    int first_command = 1;  // of those whose failure counts
+};
+
+void PrintTo(const Change &change, std::ostream *out)
+{
+    *out << change.name;
+}
+
+const Change kChanges[] = {
+    {"Address", [] { return SetAddress("192.0.2.60"); },
+     [] {
+         EXPECT_EQ(SetAddress("192.0.2.20"), 0);
+     }},
+    {"ToDhcp", SetDhcp, BackToStatic, 3, Change::client},
+    {"FromDhcp", [] { return SetAddress("192.0.2.20"); }, [] { EXPECT_EQ(SetDhcp(), 0); }, 3, Change::client},
+    {"Gateway", [] { return TAVONetDefaultGatewaySet("192.0.2.30"); },
+     [] {
+         EXPECT_EQ(TAVONetDefaultGatewaySet("192.0.2.99"), 0);
+     }},
+    {"Name", [] { return TAVOLnxSetHostname("attic"); },
+     [] {
+         EXPECT_EQ(TAVOLnxSetHostname("here"), 0);
+     }},
+    {"Mtu", [] { return TAVONetSetMTUValue("eth0", 1400); },
+     [] {
+         EXPECT_EQ(TAVONetSetMTUValue("eth0", 1500), 0);
+     }},
+    {"Servers", [] { return SetServer("192.0.2.54"); },
+     [] {
+         EXPECT_EQ(SetServer("192.0.2.53"), 0);
+     }},
+    {"Route", [] { return TAVONetRouteAdd("198.51.100.0", "255.255.255.0", "eth0"); },
+     [] {
+         ShellStatus("busybox route del -net 198.51.100.0 netmask 255.255.255.0 dev eth0 2>/dev/null");
+     }},
+    {"Bond", MakeBond, NoBond, 12, Change::nothing, 2},
+    {"IPv6Address", AddIPv6Address,
+     [] {
+         EXPECT_TRUE(HasIPv6Address() || AddIPv6Address() == 0);
+         EXPECT_EQ(RemoveIPv6Address(), 0);
+     },
+     2, Change::ipv6},
+    {"IPv6AddressGone", RemoveIPv6Address, EnsureIPv6, 2, Change::ipv6},
+    {"IPv6Route", AddIPv6Route,
+     [] {
+         EnsureIPv6();
+         EXPECT_EQ(RemoveIPv6Route(), 0);
+     },
+     2, Change::ipv6},
+    {"IPv6RouteGone", RemoveIPv6Route, EnsureIPv6, 2, Change::ipv6},
+    {"IPv6Off", [] { return TAVONetIPv6Set("eth0", 0); }, EnsureIPv6, 2, Change::ipv6},
+    {"IPv6On", [] { return TAVONetIPv6Set("eth0", 1); }, [] { EXPECT_EQ(TAVONetIPv6Set("eth0", 0), 0); }, 2,
+     Change::ipv6},
+};
+
+class Death : public test::NetworkScene {
+  protected:
+    void SetUp() override
+    {
+        NetworkScene::SetUp();
+        if (IsSkipped())
+            return;
+        if (!test::CanTrace())
+            GTEST_SKIP() << "no process may be traced here";
+        cable_->Plug(*here_, "eth1");
+        EXPECT_TRUE(here_->Run([] {
+            std::filesystem::create_directories("/etc/dhcpc");
+            EXPECT_EQ(SetAddress("192.0.2.20"), 0);
+            EXPECT_EQ(SetServer("192.0.2.53"), 0);
+            EXPECT_EQ(TAVONetSetMTUValue("eth0", 1500), 0);
+            return true;
+        }));
+    }
+};
+
+class AnyChange : public Death, public testing::WithParamInterface<Change> {
+  protected:
+    void SetUp() override
+    {
+        Death::SetUp();
+        if (IsSkipped())
+            return;
+        if (GetParam().needs == Change::ipv6 && !std::filesystem::exists("/proc/net/if_inet6"))
+            GTEST_SKIP() << "the kernel has no IPv6";
+        WriteFile("/var/standin/rc.network.hook", kBondHook, 0755);
+    }
+
+    // `body` gets the states before the change and after it.
+    void Try(const std::function<void(const std::string &before, const std::string &asked)> &body)
+    {
+        std::optional<test::ScriptedClient> client;
+        if (GetParam().needs == Change::client)
+            client.emplace(kClient);
+        EXPECT_TRUE(here_->Run([&] {
+            if (GetParam().needs == Change::ipv6)
+                EnsureIPv6();
+            GetParam().back();
+            const std::string before = State();
+            EXPECT_TRUE(HasDefaultRoute());
+            EXPECT_EQ(GetParam().make(), 0);
+            const std::string asked = State();
+            EXPECT_NE(asked, before);
+            EXPECT_TRUE(HasDefaultRoute());
+            GetParam().back();
+            EXPECT_EQ(State(), before);
+            if (!HasFailure())
+                body(before, asked);
+            return true;
+        }));
+    }
+
+    // In the child that is traced: 0, 1, or 2 for a change that was made and not stored.
+    static void Make()
+    {
+        const int result = GetParam().make();
+        ::_exit(result == 0 ? 0 : result == -2 ? 2 : 1);
+    }
+
+    static size_t Stride()
+    {
+        return static_cast<size_t>(test::Stride() * (std::getenv("TAVO_LONG_TESTS") ? 1 : GetParam().stride));
+    }
+
+    // A death has no status: -1. Afterwards all is as it was.
+    static void Judge(int status, const std::string &before, const std::string &asked, const std::string &place)
+    {
+        EXPECT_LE(status, 2) << place;
+        EXPECT_TRUE(HasDefaultRoute()) << place;
+        EXPECT_EQ(TAVONetHostsRefresh(), 0);
+        const std::string found = State();
+        EXPECT_TRUE(status == 2 || found == asked || (status != 0 && found == before))
+            << place << " status " << status << "\n"
+            << found << "\nbefore:\n"
+            << before << "\nasked:\n"
+            << asked;
+        EXPECT_FALSE(std::filesystem::exists(kRecord)) << place;
+        if (found != before)
+            GetParam().back();
+        EXPECT_EQ(State(), before) << place;
+    }
+};
+
+TEST_P(AnyChange, DiesAnywhere)
+{
+    Try([](const std::string &before, const std::string &asked) {
+        std::vector<test::SystemCall> calls = test::SystemCallsOf(Make);
+        GetParam().back();
+        std::erase_if(calls, [](const test::SystemCall &call) { return !Matters(call); });
+        EXPECT_GT(calls.size(), 5u);
+        size_t as_before = 0;
+        for (size_t i = 0; i < calls.size(); i += Stride()) {
+            if (!test::DiesAtCall(calls[i].index, Make))
+                break;
+            EXPECT_EQ(TAVONetHostsRefresh(), 0);
+            as_before += State() == before;
+            Judge(-1, before, asked, "death at call " + std::to_string(calls[i].index) + ", " + calls[i].Name());
+            if (HasFailure())
+                return;
+        }
+        EXPECT_GT(as_before, 0u);
+    });
+}
+
+TEST_P(AnyChange, FailsAtAnySystemCall)
+{
+    Try([](const std::string &before, const std::string &asked) {
+        const auto calls = test::DistinctCalls(test::SystemCallsOf(Make));
+        GetParam().back();
+        EXPECT_GT(calls.size(), 20u);
+        size_t failed = 0;
+        for (size_t i = 0; i < calls.size(); i += Stride()) {
+            for (const int error : {EIO, ENOSPC}) {
+                if (!std::getenv("TAVO_LONG_TESTS") && (error == EIO) != (i % 2 == 0))
+                    continue;
+                const test::Ending ending = test::FailsAtCall(calls[i], error, Make);
+                EXPECT_FALSE(ending.hung) << calls[i].Name();
+                const int status = WIFEXITED(ending.status) ? WEXITSTATUS(ending.status) : 128;
+                failed += status == 1;
+                Judge(status, before, asked,
+                      calls[i].Name() + " " + std::to_string(calls[i].index) + " with " + std::strerror(error));
+                if (HasFailure())
+                    return;
+            }
+        }
+        EXPECT_GT(failed, 0u);
+    });
+}
+
+// Without having done anything, and after it had done all.
+TEST_P(AnyChange, FailsAtAnyCommand)
+{
     EXPECT_TRUE(here_->Run([] {
-        std::filesystem::create_directories("/etc/dhcpc");
-        return true;
+        std::filesystem::copy_file("/bin/sh", "/tmp/sh");
+        WriteFile("/tmp/shell", kShell, 0755);
+        return ::mount("/tmp/shell", "/bin/sh", nullptr, MS_BIND, nullptr) == 0;
     }));
-    DieEverywhere(
-        [] {
-            const TAVONETCARD card = Card(TAVO_NET_DHCP);
-            return TAVONetSetCard1(&card, &card);
-        },
-        [] {
-            const TAVONETCARD card = Card(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0");
-            test::ShellStatus("busybox ifconfig eth0 0.0.0.0");
-            WriteFile(kIfcfg, "DEVICE=eth0\nONBOOT=yes\nBOOTPROTO=static\nIPADDR=192.0.2.20\nNETMASK=255.255.255.0\n"
-                              "BROADCAST=192.0.2.255\nNETWORK=192.0.2.0\n");
-            EXPECT_EQ(TAVONetSetCard1(&card, &card), 0);
-        });
-}
-
-TEST_F(Death, LeavesAGateway)
-{
-    const auto set = [] {
-        return TAVONetDefaultGatewaySet("192.0.2.30");
-    };
-    const auto back = [] {
-        EXPECT_EQ(TAVONetDefaultGatewaySet("192.0.2.99"), 0);
-    };
-    DieEverywhere(set, back);
-    EXPECT_TRUE(here_->Run([=] {
-        back();
-        return true;
-    }));
-    FailEverywhere(set, back);
-}
-
-TEST_F(Death, LeavesAName)
-{
-    DieEverywhere([] { return TAVOLnxSetHostname("attic"); }, [] { EXPECT_EQ(TAVOLnxSetHostname("here"), 0); });
-}
-
-TEST_F(Death, LeavesAnMtuAndServers)
-{
-    DieEverywhere([] { return TAVONetSetMTUValue("eth0", 1400); },
-                  [] { EXPECT_EQ(TAVONetSetMTUValue("eth0", 1500), 0); });
-    DieEverywhere([] { return TAVONetDNSSet(test::MakeList({"192.0.2.54"}).get()); },
-                  [] { EXPECT_EQ(TAVONetDNSSet(test::MakeList({"192.0.2.53"}).get()), 0); });
-}
-
-TEST_F(Death, LeavesAnIPv6Address)
-{
-    const auto remove = [] {
-        return TAVONetIPv6AddrDel("eth0", "2001:db8::20", 64);
-    };
-    const auto add = [] {
-        return TAVONetIPv6AddrAdd("eth0", "2001:db8::20", 64);
-    };
-    if (!std::filesystem::exists("/proc/net/if_inet6"))
-        GTEST_SKIP() << "the kernel has no IPv6";
-    EXPECT_TRUE(here_->Run([&] { return add() == 0 && remove() == 0; }));
-    DieEverywhere(add, [=] {
-        if (State().find("2001:db8") != std::string::npos) {
-            EXPECT_EQ(remove(), 0);
+    Try([](const std::string &before, const std::string &asked) {
+        const auto commands_left = [](int from, int is_run, int &result) {
+            WriteFile("/tmp/failing", std::to_string(from) + " " + std::to_string(is_run) + "\n");
+            result = GetParam().make();
+            const int left = std::stoi(ReadFile("/tmp/failing"));
+            std::filesystem::remove("/tmp/failing");
+            return left;
+        };
+        constexpr int many = 1000;
+        int result = -1;
+        const int commands = many - commands_left(many, 0, result);
+        EXPECT_EQ(result, 0);
+        GetParam().back();
+        for (int i = 1; i <= commands; ++i) {
+            for (const int is_run : {0, 1}) {
+                if (i < GetParam().first_command && !is_run)
+                    continue;  // a network that was not stopped is the start script's affair
+                EXPECT_LE(commands_left(i, is_run, result), 0);
+                Judge(result == -2  ? 2
+                      : result == 0 ? 0
+                                    : 1,
+                      before, asked,
+                      "command " + std::to_string(i) + " of " + std::to_string(commands) + ", run " +
+                          std::to_string(is_run));
+                if (HasFailure())
+                    return;
+            }
         }
     });
 }
+
+std::string NameOf(const testing::TestParamInfo<Change> &change)
+{
+    return change.param.name;
+}
+
+INSTANTIATE_TEST_SUITE_P(Of, AnyChange, testing::ValuesIn(kChanges), NameOf);
 
 // To DHCP and back, whatever the server does: the box can always be reached from beyond its router.
 TEST_F(Death, IsNotWhatALeaseCosts)
@@ -272,29 +488,24 @@ TEST_F(Death, IsNotWhatALeaseCosts)
     ASSERT_EQ(router.Shell("ifconfig eth0 192.0.2.99 netmask 255.255.255.0 up && ip addr add 192.0.2.98/24 dev eth0 && "
                            "ip addr add 198.51.100.1/32 dev lo"),
               0);
-    const auto scripted = [](const char *tool) {
-        return std::string("#!/bin/sh\nexec /bin/busybox ") + tool + " \"$@\"\n";
-    };
-    test::Scenario scenario;
-    scenario.InAnyOrder();
-    scenario.ExpectAny("/sbin/ifconfig").AnyTimes().Runs(scripted("ifconfig"));
-    scenario.ExpectAny("/sbin/route").AnyTimes().Runs(scripted("route"));
     // As /tmp/server says: a lease, with this router or that, none at all, or one of which the client dies.
-    scenario.ExpectAny("/sbin/dhcpcd").AnyTimes().Runs(R"(#!/bin/sh
-read server router </tmp/server
-[ "$server" != absent ] || exit 1
+    const test::ScriptedClient client(R"(#!/bin/sh
+read -r server router patience </tmp/server
+[ "$server" != absent ] || { sleep "$patience"; exit 1; }
 busybox ifconfig "$2" 192.0.2.40 netmask 255.255.255.0
 [ "$server" != dying ] || kill -9 $$
 busybox route add default gw $router
 printf 'IPADDR=192.0.2.40\nNETMASK=255.255.255.0\nGATEWAY=%s\n' $router >/etc/dhcpc/dhcpcd-"$2".info
 )");
     const char *const servers[] = {"there 192.0.2.98", "absent", "dying", "there 192.0.2.99"};
+    const bool is_long = std::getenv("TAVO_LONG_TESTS");
     const int rounds = test::Rounds(100);
     for (int round = 0; round < rounds; ++round) {
         const std::string server = servers[round % 4];
+        // A client gives up after 30 s; most rounds have not the time.
+        const int patience = !is_long ? 0 : round % 28 == 1 ? 30 : 2;
         EXPECT_TRUE(here_->Run([&] {
-            std::filesystem::create_directories("/etc/dhcpc");
-            WriteFile("/tmp/server", server + "\n");
+            WriteFile("/tmp/server", server + (server == "absent" ? " - " : " ") + std::to_string(patience) + "\n");
             const TAVONETCARD lease = Card(TAVO_NET_DHCP);
             const TAVONETCARD fixed = Card(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0");
             const bool works = server.starts_with("there");
@@ -304,7 +515,7 @@ printf 'IPADDR=192.0.2.40\nNETMASK=255.255.255.0\nGATEWAY=%s\n' $router >/etc/dh
                 char live[20] = "";
                 EXPECT_EQ(TAVONetDefaultGatewayGet(live, sizeof live), 0);
                 EXPECT_EQ(live, gateway) << server;
-                EXPECT_EQ(test::ShellStatus("busybox ping -c 1 -w 5 198.51.100.1 >/dev/null"), 0) << server;
+                EXPECT_EQ(ShellStatus("busybox ping -c 1 -w 5 198.51.100.1 >/dev/null"), 0) << server;
                 EXPECT_THAT(Text("/etc/hosts"),
                             testing::HasSubstr(card == &lease && works ? "192.0.2.40\there\n" : "192.0.2.20\there\n"));
             }

@@ -4,9 +4,7 @@
 #include "network/card_record.h"
 #include "support/container_text.h"
 #include "support/fault_state.h"
-#include "support/scenario.h"
-#include "support/scratch_dir.h"
-#include "support/virtual_cable.h"
+#include "support/network_scene.h"
 
 #include <gmock/gmock.h>
 
@@ -22,10 +20,9 @@
 #include <unistd.h>
 
 using test::Card;
+using test::kIfcfg;
 using test::Node;
 using test::ReadFile;
-using test::VirtualCable;
-using test::WriteFile;
 using testing::AllOf;
 using testing::Contains;
 using testing::HasSubstr;
@@ -33,34 +30,18 @@ using testing::Not;
 
 namespace {
 
-constexpr const char *kIfcfg = "/etc/sysconfig/network-scripts/ifcfg-eth0";
-
-class Kernel : public testing::Test {
+class Kernel : public test::NetworkScene {
   protected:
     void SetUp() override
     {
-        if (const std::string missing = VirtualCable::Missing(); !missing.empty())
-            GTEST_SKIP() << missing;
-        cable_.emplace("cable");
-        here_.emplace("here");
+        NetworkScene::SetUp();
+        if (IsSkipped())
+            return;
         there_.emplace("there");
-        cable_->Plug(*here_, "eth0");
         cable_->Plug(*there_, "eth0");
         ASSERT_EQ(there_->Shell("ifconfig eth0 192.0.2.99 netmask 255.255.255.0 up"), 0);
-        WriteIn("/etc/sysconfig/network", "GATEWAY=192.0.2.99\nHOSTNAME=here\n");
-        WriteIn(kIfcfg, "DEVICE=eth0\nONBOOT=yes\nBOOTPROTO=static\n");
     }
 
-    void WriteIn(const char *path, const char *text) const
-    {
-        EXPECT_TRUE(here_->Run([=] {
-            WriteFile(path, text);
-            return true;
-        }));
-    }
-
-    std::optional<VirtualCable> cable_;
-    std::optional<Node> here_;
     std::optional<Node> there_;
 };
 
@@ -266,14 +247,7 @@ exec busybox udhcpc -f -n -q -i "$2" -t 3 -T 1 -s $script
 
 TEST_F(Kernel, GetsALeaseFromAServer)
 {
-    const auto scripted = [](const char *tool) {
-        return std::string("#!/bin/sh\nexec /bin/busybox ") + tool + " \"$@\"\n";
-    };
-    test::Scenario scenario;
-    scenario.InAnyOrder();
-    scenario.ExpectAny("/sbin/ifconfig").AnyTimes().Runs(scripted("ifconfig"));
-    scenario.ExpectAny("/sbin/route").AnyTimes().Runs(scripted("route"));
-    scenario.ExpectAny("/sbin/dhcpcd").AnyTimes().Runs(kClient);
+    const test::ScriptedClient client(kClient);
     EXPECT_TRUE(here_->Run([] {
         const TAVONETCARD fixed = Card(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0");
         EXPECT_EQ(TAVONetSetCard1(&fixed, nullptr), 0);

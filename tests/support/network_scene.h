@@ -1,0 +1,59 @@
+// An appliance with one card on a virtual cable, static, with a stored gateway and a name: where tests of the network run
+// against a kernel.
+#ifndef TESTS_SUPPORT_NETWORK_SCENE_H
+#define TESTS_SUPPORT_NETWORK_SCENE_H
+
+#include "support/scenario.h"
+#include "support/scratch_dir.h"
+#include "support/virtual_cable.h"
+
+#include <gtest/gtest.h>
+
+#include <optional>
+#include <string>
+#include <string_view>
+
+namespace test {
+
+inline constexpr const char *kIfcfg = "/etc/sysconfig/network-scripts/ifcfg-eth0";
+
+class NetworkScene : public testing::Test {
+  protected:
+    void SetUp() override
+    {
+        if (const std::string missing = VirtualCable::Missing(); !missing.empty())
+            GTEST_SKIP() << missing;
+        cable_.emplace("cable");
+        here_.emplace("here");
+        cable_->Plug(*here_, "eth0");
+        EXPECT_TRUE(here_->Run([] {
+            WriteFile("/etc/sysconfig/network", "GATEWAY=192.0.2.99\nHOSTNAME=here\n");
+            WriteFile(kIfcfg, "DEVICE=eth0\nONBOOT=yes\nBOOTPROTO=static\n");
+            return true;
+        }));
+    }
+
+    std::optional<VirtualCable> cable_;
+    std::optional<Node> here_;
+};
+
+// /sbin/dhcpcd is this script, and the tools that it and the library run are those of the root.
+class ScriptedClient {
+  public:
+    explicit ScriptedClient(std::string_view script)
+    {
+        scenario_.InAnyOrder();
+        for (const char *tool : {"ifconfig", "route"})
+            scenario_.ExpectAny(std::string("/sbin/") + tool)
+                .AnyTimes()
+                .Runs(std::string("#!/bin/sh\nexec /bin/busybox ") + tool + " \"$@\"\n");
+        scenario_.ExpectAny("/sbin/dhcpcd").AnyTimes().Runs(script);
+    }
+
+  private:
+    Scenario scenario_;
+};
+
+}  // namespace test
+
+#endif
