@@ -1,5 +1,6 @@
 // tavoctl group: local groups.
 #include "account/account_check.h"
+#include "account/account_plans.h"
 #include "account/account_use.h"
 #include "account/account_verbs.h"
 #include "account/group_record.h"
@@ -164,35 +165,11 @@ Action GroupImport(Arguments &in)
     const auto path = in.Text("FILE", file_path, "the list, or - for standard input");
     const auto update = in.Flag("--update", "change groups that are there, in place of refusing the list");
     return [=](Call &call) {
-        ImportedRows<GroupKind> rows(*path, *update);
-        std::vector<std::pair<std::optional<Group>, Group>> wanted;
-        for (const AccountRow &row : ParseAccountRows(ReadWhole(*path), Names(group_export_columns))) {
-            const std::optional<Group> old = rows.Present(row);
-            Group group = old.value_or(Group{});
-            group.name = *row.Find("name");
-            if (const std::string *text = row.Find("description"))
-                group.description = *text;
-            if (const std::string *text = row.Find("members"))
-                group.members = ExistingUsers(*text);
-            if (const auto gid = rows.IdIn(row, "gid")) {
-                rows.TakeId(row, *gid);
-                group.gid = *gid;
-            }
-            CheckGroup(group, rows.Attempted(row));
-            const std::size_t before = call.report.changes.size();
-            call.Compare("group " + group.name, group_columns, old, std::optional(group));
-            if (call.report.changes.size() > before)
-                wanted.emplace_back(old, std::move(group));
-        }
-        if (!call.Proceed())
-            return;
-        Progress progress("importing");
-        for (std::size_t i = 0; i < wanted.size(); ++i) {
-            const auto &[old, group] = wanted[i];
-            progress.Show(std::to_string(i) + " of " + std::to_string(wanted.size()));
-            SetGroup(old ? std::optional(old->name) : std::nullopt, group,
-                     "import " + *path + ", " + std::to_string(i) + " groups are done, the next is " + group.name);
-        }
+        const GroupPlan plan =
+            PlanGroups(call, *path, *update, ParseAccountRows(ReadWhole(*path), Names(group_export_columns)),
+                       [](const std::string &name) { return ReadUser(name).name; });
+        if (call.Proceed())
+            CarryOut(plan);
     };
 }
 
@@ -219,6 +196,54 @@ Action GroupCheck(Arguments &)
 }
 
 }  // namespace
+
+GroupPlan PlanGroups(Call &call, const std::string &path, bool update, const std::vector<AccountRow> &list,
+                     const std::function<std::string(const std::string &)> &member_name)
+{
+    ImportedRows<GroupKind> rows(path, update);
+    GroupPlan plan = {path, {}};
+    for (const AccountRow &row : list) {
+        const std::optional<Group> old = rows.Present(row);
+        Group group = old.value_or(Group{});
+        group.name = *row.Find("name");
+        if (const std::string *text = row.Find("description"))
+            group.description = *text;
+        if (const std::string *text = row.Find("members")) {
+            std::vector<std::string> members = SplitNames(*text);
+            std::transform(members.begin(), members.end(), members.begin(), member_name);
+            // Their order means nothing, and no list has the strangers.
+            const std::vector<std::string> users = old ? GroupMembers(old->name) : std::vector<std::string>();
+            if (!std::is_permutation(members.begin(), members.end(), users.begin(), users.end()))
+                group.members = std::move(members);
+        }
+        if (const auto gid = rows.IdIn(row, "gid")) {
+            rows.TakeId(row, *gid);
+            group.gid = *gid;
+        }
+        CheckGroup(group, rows.Attempted(row));
+        const std::size_t before = call.report.changes.size();
+        call.Compare("group " + group.name, group_columns, old, std::optional(group));
+        if (call.report.changes.size() > before)
+            plan.changes.emplace_back(old, std::move(group));
+    }
+    return plan;
+}
+
+void CarryOut(const GroupPlan &plan)
+{
+    Progress progress("importing");
+    for (std::size_t i = 0; i < plan.changes.size(); ++i) {
+        const auto &[old, group] = plan.changes[i];
+        progress.Show(std::to_string(i) + " of " + std::to_string(plan.changes.size()));
+        SetGroup(old ? std::optional(old->name) : std::nullopt, group,
+                 "import " + plan.path + ", " + std::to_string(i) + " groups are done, the next is " + group.name);
+    }
+}
+
+std::vector<Group> AllGroups()
+{
+    return GroupKind::All({}, {});
+}
 
 void AddGroup(Program &program)
 {

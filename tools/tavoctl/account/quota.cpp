@@ -1,4 +1,6 @@
 // tavoctl quota: limits on the space of users on volumes.
+#include "account/quota.h"
+
 #include "account/user_record.h"
 #include "families.h"
 #include "frame/failure.h"
@@ -15,22 +17,7 @@ namespace tavoctl {
 namespace {
 
 constexpr char volume_help[] = "number of the volume: 1 for /volume1";
-constexpr double kib_in_mb = 1024;
 constexpr int64_t most_volumes = 9999;
-
-struct UserQuota {
-    std::string user;
-    int volume;
-    std::optional<int64_t> limit;  // KiB
-    int64_t used;
-};
-
-constexpr Column<UserQuota> quota_columns[] = {
-    {"volume", field<&UserQuota::volume>, "its number"},
-    {"user", field<&UserQuota::user>},
-    {"limit_kib", field<&UserQuota::limit>, "null: no limit", in_list, "KiB"},
-    {"used_bytes", field<&UserQuota::used>, "", in_list, "bytes"},
-};
 
 // Megabytes of "1536K", "1.5M", "2G", "1T" or a number alone; "none" takes the limit away.
 std::optional<double> LimitOf(const std::string &text)
@@ -55,17 +42,6 @@ constexpr ArgumentKind limit_kind = {
     .wrong = "much",
 };
 
-std::optional<UserQuota> QuotaOf(const std::string &user, const MountedVolume &volume)
-{
-    TAVOQUOTA quota = {};
-    if (TAVOQuotaGet(user.c_str(), volume.device.c_str(), &quota) != 0)
-        return {};
-    UserQuota found = {user, volume.number, {}, static_cast<int64_t>(quota.cbUsed)};
-    if (quota.rLimit > 0)
-        found.limit = std::llround(static_cast<double>(quota.rLimit) * kib_in_mb);
-    return found;
-}
-
 UserQuota ReadQuota(const std::string &user, const MountedVolume &volume)
 {
     const auto quota = QuotaOf(user, volume);
@@ -79,15 +55,13 @@ Action QuotaSwitch(Arguments &in, bool on)
     const auto volume = in.Number("VOLUME", "VOLUME", volume_help, 1, most_volumes);
     return [=](Call &call) {
         const MountedVolume mounted = FindVolume(static_cast<int>(**volume));
-        const std::string attempted = std::string("switch quotas ") + (on ? "on" : "off") + " for " + mounted.path;
         call.Change(mounted.path, "quotas", {}, on);
         if (!call.Proceed())
             return;
-        Progress progress("switching quotas on");
         if (on)
-            progress.Show("counting what users have on " + mounted.path);
-        const int result = on ? TAVOQuotaInit(mounted.number) : TAVOQuotaOff(mounted.number);
-        Must(result == 0, attempted, HintFor{ERR_QUOTA_CHECK, "stop what writes to the volume"});
+            SwitchQuotasOn(mounted);
+        else
+            Must(TAVOQuotaOff(mounted.number) == 0, "switch quotas off for " + mounted.path);
     };
 }
 
@@ -107,8 +81,7 @@ Action QuotaSet(Arguments &in)
         call.Compare("user " + *user + " on " + volume.path, quota_columns, std::optional(before),
                      std::optional(after));
         if (call.Proceed())
-            Must(TAVOQuotaSet(user->c_str(), volume.device.c_str(), &megabytes) == 0,
-                 "limit " + *user + " on " + volume.path);
+            SetLimit(*user, volume, megabytes);
     };
 }
 
@@ -125,24 +98,57 @@ Action QuotaReport(Arguments &in)
 {
     const auto number = in.OptionalText("VOLUME", volume_kind, volume_help);
     return [=](Call &call) {
-        std::vector<MountedVolume> volumes = MountedVolumes();
-        if (*number)
-            volumes = {FindVolume(**number)};
-        else
-            std::erase_if(volumes, [](const MountedVolume &v) { return TAVOQuotaFmtGet(v.device.c_str()) < 0; });
         std::vector<UserQuota> quotas;
-        for (const MountedVolume &volume : volumes)
-            for (const std::string &user : UserNames()) {
-                if (const auto quota = QuotaOf(user, volume))
-                    quotas.push_back(*quota);
-                else if (TLIBErrGet() != ERR_NO_SUCH_USER)  // deleted since
-                    throw LibraryFailure("read the limit of " + user + " on " + volume.path);
-            }
+        for (const MountedVolume &volume : *number ? std::vector{FindVolume(**number)} : MountedVolumes())
+            if (*number || HasQuotas(volume))
+                for (const UserQuota &quota : QuotasOn(volume))
+                    quotas.push_back(quota);
         call.List(quota_columns, quotas);
     };
 }
 
 }  // namespace
+
+std::optional<UserQuota> QuotaOf(const std::string &user, const MountedVolume &volume)
+{
+    TAVOQUOTA quota = {};
+    if (TAVOQuotaGet(user.c_str(), volume.device.c_str(), &quota) != 0)
+        return {};
+    UserQuota found = {user, volume.number, {}, static_cast<int64_t>(quota.cbUsed)};
+    if (quota.rLimit > 0)
+        found.limit = std::llround(static_cast<double>(quota.rLimit) * kib_in_mb);
+    return found;
+}
+
+bool HasQuotas(const MountedVolume &volume)
+{
+    return TAVOQuotaFmtGet(volume.device.c_str()) >= 0;
+}
+
+std::vector<UserQuota> QuotasOn(const MountedVolume &volume)
+{
+    std::vector<UserQuota> quotas;
+    for (const std::string &user : UserNames()) {
+        if (const auto quota = QuotaOf(user, volume))
+            quotas.push_back(*quota);
+        else if (TLIBErrGet() != ERR_NO_SUCH_USER)  // deleted since
+            throw LibraryFailure("read the limit of " + user + " on " + volume.path);
+    }
+    return quotas;
+}
+
+void SwitchQuotasOn(const MountedVolume &volume)
+{
+    Progress progress("switching quotas on");
+    progress.Show("counting what users have on " + volume.path);
+    Must(TAVOQuotaInit(volume.number) == 0, "switch quotas on for " + volume.path,
+         HintFor{ERR_QUOTA_CHECK, "stop what writes to the volume"});
+}
+
+void SetLimit(const std::string &user, const MountedVolume &volume, float megabytes)
+{
+    Must(TAVOQuotaSet(user.c_str(), volume.device.c_str(), &megabytes) == 0, "limit " + user + " on " + volume.path);
+}
 
 void AddQuota(Program &program)
 {

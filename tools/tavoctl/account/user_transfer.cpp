@@ -1,4 +1,5 @@
 // tavoctl user: many accounts at once, from and to files.
+#include "account/account_plans.h"
 #include "account/user_verbs.h"
 #include "frame/password.h"
 
@@ -29,17 +30,6 @@ std::map<std::string, SambaHashes> ReadSambaHashes()
     return found;
 }
 
-struct GivenHashes {
-    std::string name, password, lm, nt;
-};
-
-// What a list asks for.
-struct UserPlan {
-    std::vector<UserChange> changes;
-    std::vector<GivenHashes> hashes;
-    int additions = 0;
-};
-
 // What the row says goes into the user; an empty value says nothing, except of free texts.
 void ApplyRow(const AccountRow &row, User &user)
 {
@@ -69,9 +59,11 @@ void ApplyRow(const AccountRow &row, User &user)
     }
 }
 
+constexpr char locked_hash[] = "!";
+
 // The password of a row, or its hashes, or what the options say. True when it is going to be another one.
-bool ChoosePassword(const AccountRow &row, const PasswordChoice &choice, const std::string &attempted,
-                    UserChange &change, std::vector<GivenHashes> &hashes)
+bool ChoosePassword(const AccountRow &row, const PasswordChoice *choice, const std::string &attempted,
+                    UserChange &change, UserPlan &plan)
 {
     const auto value = [&](const char *column) {
         const std::string *text = row.Find(column);
@@ -84,17 +76,23 @@ bool ChoosePassword(const AccountRow &row, const PasswordChoice &choice, const s
         throw UsageFailure(attempted, "of the three hashes some are missing");
     if (hashed && !password.empty())
         throw UsageFailure(attempted, "it has a password and hashes of one");
-    const bool differs = hashed && change.user.password != given.password;
+    bool differs = hashed && change.user.password != given.password;
     if (!password.empty())
         change.user.password = password;
     else if (hashed && !change.old_name)
         change.user.password = UnknownPassword();  // for the moment until the hashes are stored
-    else if (!change.old_name && choice.IsMade())
-        change.user.password = choice.For(change.user.name);
-    else if (!change.old_name)
+    else if (!hashed && !choice && row.Find("password_hash")) {
+        differs = !change.user.password.empty();
+        change.user.password.clear();
+    } else if (!hashed && !change.old_name && !choice) {
+        change.user.password = UnknownPassword();  // Samba's hashes stay those of it
+        plan.locked.push_back(change.user.name);
+    } else if (!hashed && !change.old_name && choice->IsMade())
+        change.user.password = choice->For(change.user.name);
+    else if (!hashed && !change.old_name)
         throw UsageFailure(attempted, "it has no password", "say --unknown-password or --empty-password");
-    if (differs || (hashed && !change.old_name))
-        hashes.push_back(given);
+    if (hashed && (differs || !change.old_name))
+        plan.hashes.push_back(given);
     return differs || !password.empty() || !change.old_name;
 }
 
@@ -129,28 +127,87 @@ void StoreHashes(const std::vector<GivenHashes> &hashes, const std::string &atte
 
 }  // namespace
 
+UserPlan PlanUsers(Call &call, const std::string &path, bool update, const std::vector<AccountRow> &list,
+                   const PasswordChoice *password)
+{
+    ImportedRows<UserKind> rows(path, update);
+    UserPlan plan = {.path = path};
+    for (const AccountRow &row : list) {
+        const std::optional<User> old = rows.Present(row);
+        UserChange change = {.old_name = {}, .user = old.value_or(User{})};
+        if (old)
+            change.old_name = old->name;
+        else
+            ++plan.additions;
+        ApplyRow(row, change.user);
+        if (old)
+            change.user.home = old->home;  // the library moves none
+        if (const int uid = change.user.uid; uid >= 0 && !(old && old->uid == uid))
+            rows.TakeId(row, uid);
+        User described = change.user;
+        const bool differs = ChoosePassword(row, password, rows.Attempted(row), change, plan);
+        const std::string object = "user " + change.user.name;
+        const std::size_t before = call.report.changes.size();
+        const bool locked = !plan.locked.empty() && plan.locked.back() == change.user.name;
+        described.password = old ? old->password : locked ? locked_hash : change.user.password;
+        call.Compare(object, user_columns, old, std::optional(described));
+        if (old && differs)
+            call.Change(object, "password", PasswordState(old->password), "new");
+        if (call.report.changes.size() > before)
+            plan.changes.push_back(std::move(change));
+    }
+    RefuseTooMany(plan.additions, "import " + path);
+    return plan;
+}
+
+void CarryOut(const UserPlan &plan)
+{
+    const int last = LastUserId();
+    SetUsers(plan.changes, "import " + plan.path);
+    std::vector<GivenHashes> hashes = plan.hashes;
+    const auto samba = plan.locked.empty() ? std::map<std::string, SambaHashes>() : ReadSambaHashes();
+    for (const std::string &name : plan.locked)
+        if (const auto found = samba.find(AccountKey(name)); found != samba.end())
+            hashes.push_back({name, locked_hash, found->second.lm, found->second.nt});
+    StoreHashes(hashes, "store the hashes of " + plan.path);
+    for (const UserChange &change : plan.changes) {
+        if (change.old_name)
+            continue;
+        WarnOfName(change.user.name);
+        if (change.user.uid < 0)
+            WarnOfReusedId(change.user.name, ReadUser(change.user.name).uid, last);
+    }
+}
+
+Table ExportedUsers(const std::vector<User> &users, bool hashes)
+{
+    const auto samba = hashes ? ReadSambaHashes() : std::map<std::string, SambaHashes>();
+    std::vector<ColumnFacts> columns = Facts(user_export_columns);
+    std::erase_if(columns, [&](const ColumnFacts &column) { return column.place == in_one && !hashes; });
+    for (ColumnFacts &column : columns)
+        column.place = in_list;
+    Table table(columns);
+    for (const User &user : users) {
+        ExportedUser exported = {user, {}, {}, {}};
+        const auto found = samba.find(AccountKey(user.name));
+        if (found != samba.end() && user.password.starts_with('$'))
+            exported = {user, user.password, found->second.lm, found->second.nt};
+        else if (user.password.empty())
+            exported.hash = "";
+        std::vector<Cell> row;
+        for (std::size_t i = 0; i < columns.size(); ++i)
+            row.push_back(user_export_columns[i].read(exported));
+        table.Add(std::move(row));
+    }
+    return table;
+}
+
 Action UserExport(Arguments &in)
 {
     const auto hashes = in.Flag("--hashes", "with the hashes of the passwords");
     const auto path = in.Option("--output", "PATH", file_path, "a new file that only root can read (standard output)");
     return [=](Call &call) {
-        const auto samba = *hashes ? ReadSambaHashes() : std::map<std::string, SambaHashes>();
-        std::vector<ColumnFacts> columns = Facts(user_export_columns);
-        std::erase_if(columns, [&](const ColumnFacts &column) { return column.place == in_one && !*hashes; });
-        for (ColumnFacts &column : columns)
-            column.place = in_list;
-        Table table(columns);
-        for (const User &user : UserKind::All({}, {})) {
-            ExportedUser exported = {user, {}, {}, {}};
-            const auto found = samba.find(AccountKey(user.name));
-            if (found != samba.end() && user.password.starts_with('$'))
-                exported = {user, user.password, found->second.lm, found->second.nt};
-            std::vector<Cell> row;
-            for (std::size_t i = 0; i < columns.size(); ++i)
-                row.push_back(user_export_columns[i].read(exported));
-            table.Add(std::move(row));
-        }
-        Export(call, table, *path);
+        Export(call, ExportedUsers(UserKind::All({}, {}), *hashes), *path);
     };
 }
 
@@ -162,42 +219,9 @@ Action UserImport(Arguments &in)
     return [=](Call &call) {
         std::vector<std::string> columns = Names(user_export_columns);
         columns.emplace_back("password");
-        ImportedRows<UserKind> rows(*path, *update);
-        UserPlan plan;
-        for (const AccountRow &row : ParseAccountRows(ReadWhole(*path), columns)) {
-            const std::optional<User> old = rows.Present(row);
-            UserChange change = {.old_name = {}, .user = old.value_or(User{})};
-            if (old)
-                change.old_name = old->name;
-            else
-                ++plan.additions;
-            ApplyRow(row, change.user);
-            if (const int uid = change.user.uid; uid >= 0 && !(old && old->uid == uid))
-                rows.TakeId(row, uid);
-            User described = change.user;
-            const bool differs = ChoosePassword(row, password, rows.Attempted(row), change, plan.hashes);
-            const std::string object = "user " + change.user.name;
-            const std::size_t before = call.report.changes.size();
-            described.password = old ? old->password : change.user.password;
-            call.Compare(object, user_columns, old, std::optional(described));
-            if (old && differs)
-                call.Change(object, "password", PasswordState(old->password), "new");
-            if (call.report.changes.size() > before)
-                plan.changes.push_back(std::move(change));
-        }
-        RefuseTooMany(plan.additions, "import " + *path);
-        if (!call.Proceed())
-            return;
-        const int last = LastUserId();
-        SetUsers(plan.changes, "import " + *path);
-        StoreHashes(plan.hashes, "store the hashes of " + *path);
-        for (const UserChange &change : plan.changes) {
-            if (change.old_name)
-                continue;
-            WarnOfName(change.user.name);
-            if (change.user.uid < 0)
-                WarnOfReusedId(change.user.name, ReadUser(change.user.name).uid, last);
-        }
+        const UserPlan plan = PlanUsers(call, *path, *update, ParseAccountRows(ReadWhole(*path), columns), &password);
+        if (call.Proceed())
+            CarryOut(plan);
     };
 }
 

@@ -1,6 +1,5 @@
 // tavoctl conf: settings files, lines of key and value.
 #include "families.h"
-#include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/program.h"
 #include "frame/settings_file.h"
@@ -94,24 +93,6 @@ Action ConfList(Arguments &in)
     };
 }
 
-// A file in which every value is quoted stays one.
-bool QuotesAll(const SettingsFile &file)
-{
-    StringList lines;
-    int quoted = 0;
-    if (TLIBFileReadLines(file.Path().c_str(), lines.Address()) < 0)
-        return false;
-    for (const std::string &line : lines.Items()) {
-        const auto setting = SplitSetting(line);
-        if (!setting)
-            continue;
-        if (line.find("=\"") == std::string::npos)
-            return false;
-        ++quoted;
-    }
-    return quoted > 0;
-}
-
 // set and append differ in the library's function and in what they say.
 Action GiveValue(Arguments &in, decltype(TLIBFileAppendKey) change, const char *verb)
 {
@@ -120,7 +101,7 @@ Action GiveValue(Arguments &in, decltype(TLIBFileAppendKey) change, const char *
     const auto file = SettingsFile::OfSystem(in, changes);
     const auto quote = in.Flag("--quote", "write the value in double quotes, as in a file in which all are");
     return [=](Call &call) {
-        const char *format = *quote || QuotesAll(file) ? "%s=\"%s\"\n" : nullptr;
+        const char *format = *quote ? quoted_setting : file.LineFormat();
         file.Change(call, [&](const char *path) {
             Must(change(path, key->c_str(), value->c_str(), format) == 1,
                  std::string(verb) + " " + *key + " in " + file.Path());

@@ -16,6 +16,10 @@ std::string ReadWhole(const std::string &path);
 // To standard output for an empty path, or into a new file that only its owner can read.
 void WriteWhole(const std::string &path, const std::string &text);
 
+// Replaces a file as a whole; one without text is removed. Throws a Failure.
+void ReplaceFile(const std::string &path, const std::string &text);
+std::string FileText(const std::string &path);  // "" when it cannot be read
+
 }  // namespace tavoctl
 
 #endif

@@ -125,6 +125,23 @@ std::vector<std::string> SettingsFile::Keys() const
     return keys;
 }
 
+const char *SettingsFile::LineFormat() const
+{
+    StringList lines;
+    int quoted = 0;
+    if (TLIBFileReadLines(Path().c_str(), lines.Address()) < 0)
+        return nullptr;
+    for (const std::string &line : lines.Items()) {
+        const auto setting = SplitSetting(line);
+        if (!setting)
+            continue;
+        if (line.find("=\"") == std::string::npos)
+            return nullptr;
+        ++quoted;
+    }
+    return quoted > 0 ? quoted_setting : nullptr;
+}
+
 std::optional<std::pair<std::string, std::string>> SplitSetting(std::string line)
 {
     if (line.starts_with('#') || line.starts_with(';') || line.find('=') == std::string::npos)

@@ -13,6 +13,8 @@
 
 namespace tavoctl {
 
+inline constexpr char quoted_setting[] = "%s=\"%s\"\n";
+
 class SettingsFile {
   public:
     // Declares the options of a verb that addresses /etc/tavoinfo.conf unless another file is given, or always the file
@@ -32,6 +34,8 @@ class SettingsFile {
 
     // Every line, without its newline.
     std::vector<std::string> Lines() const;
+    // How a new line is written: a file in which every value is quoted stays one. nullptr for the library's way.
+    const char *LineFormat() const;
     // The names of its settings; none where it cannot be read.
     std::vector<std::string> Keys() const;
 

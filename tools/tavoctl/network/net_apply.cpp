@@ -1,4 +1,5 @@
 // tavoctl net export and apply: the whole network as one document.
+#include "network/net_apply.h"
 #include "frame/failure.h"
 #include "frame/held_locks.h"
 #include "frame/input_file.h"
@@ -19,13 +20,6 @@
 
 namespace tavoctl {
 namespace {
-
-// A fact of the document that the network does not have yet, in its files or in the kernel.
-struct NetDifference {
-    std::string card;  // "" for the appliance as a whole
-    const NetItem *item;
-    Cell before, after;
-};
 
 void Compare(const std::string &card, const std::vector<NetItem> &items, const NetFactsMap &wanted,
              const NetFactsMap *stored, const NetFactsMap *live, std::vector<NetDifference> &differences)
@@ -190,6 +184,27 @@ void MakeChange(const NetDocument &wanted)
 
 }  // namespace
 
+NetPlan PlanNet(Call &call, const std::string &text)
+{
+    NetPlan plan = {ParseNetDocument(text), {}};
+    RefuseUnknown(plan.wanted, StoredNet());
+    plan.differences = DifferencesTo(plan.wanted);
+    for (const NetDifference &one : plan.differences)
+        call.Change(one.card.empty() ? "network" : one.card, one.item ? one.item->name : "interface", one.before,
+                    one.after);
+    RefuseWhatIsNotKept(plan.differences);
+    return plan;
+}
+
+void CarryOut(const NetPlan &plan, bool probe, const std::optional<int64_t> &trial_seconds)
+{
+    if (probe)
+        RefuseUsedAddresses(plan.differences);
+    // A change that was cut off is no part of what this one goes back to.
+    Must(TAVONetHostsRefresh() >= 0, "finish an earlier change");
+    NetChange::Make(trial_seconds, [&] { MakeChange(plan.wanted); });
+}
+
 Action NetExport(Arguments &)
 {
     return [](Call &) {
@@ -204,20 +219,9 @@ Action NetApply(Arguments &in)
     const auto no_probe = in.Flag("--no-probe", no_probe_help);
     const auto file = in.Text("FILE", file_path, "a document, or - for standard input");
     return [=](Call &call) {
-        const NetDocument wanted = ParseNetDocument(ReadWhole(*file));
-        RefuseUnknown(wanted, StoredNet());
-        const auto differences = DifferencesTo(wanted);
-        for (const NetDifference &one : differences)
-            call.Change(one.card.empty() ? "network" : one.card, one.item ? one.item->name : "interface", one.before,
-                        one.after);
-        RefuseWhatIsNotKept(differences);
-        if (!call.Proceed())
-            return;
-        if (!*no_probe)
-            RefuseUsedAddresses(differences);
-        // A change that was cut off is no part of what this one goes back to.
-        Must(TAVONetHostsRefresh() >= 0, "finish an earlier change");
-        NetChange::Make(*seconds, [&] { MakeChange(wanted); });
+        const NetPlan plan = PlanNet(call, ReadWhole(*file));
+        if (call.Proceed())
+            CarryOut(plan, !*no_probe, *seconds);
     };
 }
 

@@ -2,13 +2,11 @@
 #include "network/net_document.h"
 
 #include "frame/failure.h"
+#include "frame/json_document.h"
 #include "frame/table.h"
 #include "network/net_text.h"
 
-#include <nlohmann/json.hpp>
-
 #include <algorithm>
-#include <set>
 
 namespace tavoctl {
 namespace {
@@ -226,38 +224,6 @@ void CheckDocument(const NetDocument &document)
     }
 }
 
-// Parsers that take the last of two equal keys let one half of a program see another document than the other.
-class KeysOnce {
-  public:
-    bool operator()(int depth, Json::parse_event_t event, Json &parsed)
-    {
-        constexpr int deepest = 8;
-        if (depth > deepest)
-            Refuse("", "nested too deeply");
-        if (event == Json::parse_event_t::object_start)
-            keys_.emplace_back();
-        else if (event == Json::parse_event_t::object_end)
-            keys_.pop_back();
-        else if (event == Json::parse_event_t::key && !keys_.back().insert(parsed.get<std::string>()).second)
-            Refuse("", "duplicate field " + parsed.get<std::string>());
-        return true;
-    }
-
-  private:
-    std::vector<std::set<std::string>> keys_;
-};
-
-Json Parse(const std::string &text)
-{
-    try {
-        return Json::parse(text, KeysOnce());
-    } catch (const Json::exception &error) {
-        std::string why = error.what();
-        why = why.substr(why.find("] ") + 2);
-        Refuse("", "not JSON: " + why.substr(0, 200));
-    }
-}
-
 Json JsonOf(const Cell &cell)
 {
     return std::visit(
@@ -336,7 +302,7 @@ bool IsGiven(const NetFactsMap &facts, const char *name)
 NetDocument ParseNetDocument(const std::string &text)
 {
     constexpr std::size_t most_cards = 256;
-    const Json json = Parse(text);
+    const Json json = ParseJsonDocument(text);
     if (!json.is_object())
         Refuse("", "not an object");
     if (!json.contains("format_version") || json["format_version"] != format_version)

@@ -4,6 +4,7 @@
 #include "frame/arguments.h"
 #include "frame/containers.h"
 #include "frame/failure.h"
+#include "frame/input_file.h"
 #include "network/net_text.h"
 #include "network/net_verbs.h"
 
@@ -11,18 +12,14 @@
 #include "tavo_net.h"
 
 #include <algorithm>
-#include <cerrno>
 #include <charconv>
 #include <cstring>
-#include <fstream>
 #include <iterator>
 #include <sstream>
 
 #include <arpa/inet.h>
-#include <fcntl.h>
 #include <ifaddrs.h>
 #include <net/route.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
 namespace tavoctl {
@@ -283,43 +280,6 @@ MoreFile ReadMoreFile(const std::string &interface)
         }
     }
     return more;
-}
-
-void ReplaceFile(const std::string &path, const std::string &text)
-{
-    const std::string attempted = "write " + path;
-    if (text.empty()) {
-        if (::unlink(path.c_str()) != 0 && errno != ENOENT)
-            throw SystemFailure(attempted, errno);
-        return;
-    }
-    std::string temp = path + ".XXXXXX";
-    struct stat st;
-    const mode_t mode = ::stat(path.c_str(), &st) == 0 ? st.st_mode & 0777 : 0644;
-    const int fd = ::mkostemp(temp.data(), O_CLOEXEC);
-    if (fd < 0)
-        throw SystemFailure(attempted, errno);
-    std::size_t done = 0;
-    while (done < text.size()) {
-        const ssize_t put = ::write(fd, text.data() + done, text.size() - done);
-        if (put < 0 && errno != EINTR)
-            break;
-        done += put > 0 ? static_cast<std::size_t>(put) : 0;
-    }
-    const bool whole = done == text.size() && ::fchmod(fd, mode) == 0 && ::fsync(fd) == 0;
-    const int error = errno;
-    ::close(fd);
-    if (whole && ::rename(temp.c_str(), path.c_str()) == 0)
-        return;
-    const int last = whole ? errno : error;
-    ::unlink(temp.c_str());
-    throw SystemFailure(attempted, last);
-}
-
-std::string FileText(const std::string &path)
-{
-    std::ifstream in(path, std::ios::binary);
-    return std::string((std::istreambuf_iterator<char>(in)), {});
 }
 
 std::string NetSetting(const std::string &path, const std::string &key)

@@ -25,10 +25,6 @@ inline constexpr char resolver_file[] = "/etc/resolv.conf";
 
 MoreFile ReadMoreFile(const std::string &interface);
 
-// Replaces a file as a whole; one without text is removed. Throws a Failure.
-void ReplaceFile(const std::string &path, const std::string &text);
-std::string FileText(const std::string &path);  // "" when it cannot be read
-
 std::string NetSetting(const std::string &path, const std::string &key);
 std::string InterfaceFileOf(const std::string &interface);
 

@@ -4,6 +4,7 @@
 #include "frame/arguments.h"
 #include "frame/containers.h"
 #include "frame/failure.h"
+#include "frame/input_file.h"
 #include "network/net_card.h"
 #include "network/net_present.h"
 #include "network/net_text.h"

@@ -4,6 +4,7 @@
 #include "storage/arrays.h"
 #include "storage/disk_facts.h"
 #include "storage/partitions.h"
+#include "storage/storage_tree.h"
 #include "storage/volumes.h"
 
 #include "tavo_disk.h"
@@ -197,12 +198,22 @@ class Tree {
 Action StorageShow(Arguments &)
 {
     return [](Call &call) {
-        const std::vector<std::string> disks = DiskPaths();
-        call.Print(Tree(std::none_of(disks.begin(), disks.end(), Sleeps)).Draw());
+        call.Print(StorageTree());
     };
 }
 
 }  // namespace
+
+Table StorageTree()
+{
+    const std::vector<std::string> disks = DiskPaths();
+    return Tree(std::none_of(disks.begin(), disks.end(), Sleeps)).Draw();
+}
+
+std::vector<ColumnFacts> StorageColumns()
+{
+    return Facts(node_columns);
+}
 
 void AddStorage(Program &program)
 {

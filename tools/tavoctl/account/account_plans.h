@@ -1,0 +1,57 @@
+// Lists of accounts: looked at as a whole, then carried out.
+#ifndef TAVOCTL_ACCOUNT_PLANS_H
+#define TAVOCTL_ACCOUNT_PLANS_H
+
+#include "account/account_rows.h"
+#include "account/group_record.h"
+#include "account/user_record.h"
+#include "frame/password.h"
+#include "frame/verb.h"
+
+#include <functional>
+#include <optional>
+#include <string>
+#include <utility>
+#include <vector>
+
+namespace tavoctl {
+
+struct GivenHashes {
+    std::string name, password, lm, nt;
+};
+
+// What a list of users asks for.
+struct UserPlan {
+    std::string path;  // of the list
+    std::vector<UserChange> changes = {};
+    std::vector<GivenHashes> hashes = {};
+    std::vector<std::string> locked = {};  // new ones that nobody can use until they have a password
+    int additions = 0;
+};
+
+// Looks at every row and notes in the call what differs; throws a Failure for what is refused. `password`: what the options
+// say for a new user whose row has none; nullptr: it is locked, and an empty hash is no password.
+UserPlan PlanUsers(Call &call, const std::string &path, bool update, const std::vector<AccountRow> &rows,
+                   const PasswordChoice *password);
+void CarryOut(const UserPlan &plan);
+
+// The accounts as export writes them.
+Table ExportedUsers(const std::vector<User> &users, bool hashes);
+
+// The groups that are there, and what a list makes of them.
+struct GroupPlan {
+    std::string path;
+    std::vector<std::pair<std::optional<Group>, Group>> changes;
+};
+
+// `member_name`: the name of a member as its account has it; throws a Failure for one that is no user.
+GroupPlan PlanGroups(Call &call, const std::string &path, bool update, const std::vector<AccountRow> &rows,
+                     const std::function<std::string(const std::string &)> &member_name);
+void CarryOut(const GroupPlan &plan);
+
+// All that the library lists, each with those of its members that are users.
+std::vector<Group> AllGroups();
+
+}  // namespace tavoctl
+
+#endif

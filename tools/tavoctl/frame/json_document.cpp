@@ -1,0 +1,53 @@
+// JSON that a caller hands in.
+#include "frame/json_document.h"
+
+#include "frame/failure.h"
+
+#include <set>
+#include <vector>
+
+namespace tavoctl {
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+[[noreturn]] void RefuseDocument(const std::string &why)
+{
+    throw UsageFailure("take the document", why);
+}
+
+// Parsers that take the last of two equal keys let one half of a program see another document than the other.
+class KeysOnce {
+  public:
+    bool operator()(int depth, Json::parse_event_t event, Json &parsed)
+    {
+        constexpr int deepest = 8;
+        if (depth > deepest)
+            RefuseDocument("nested too deeply");
+        if (event == Json::parse_event_t::object_start)
+            keys_.emplace_back();
+        else if (event == Json::parse_event_t::object_end)
+            keys_.pop_back();
+        else if (event == Json::parse_event_t::key && !keys_.back().insert(parsed.get<std::string>()).second)
+            RefuseDocument("duplicate field " + parsed.get<std::string>());
+        return true;
+    }
+
+  private:
+    std::vector<std::set<std::string>> keys_;
+};
+
+}  // namespace
+
+Json ParseJsonDocument(const std::string &text)
+{
+    try {
+        return Json::parse(text, KeysOnce());
+    } catch (const Json::exception &error) {
+        std::string why = error.what();
+        why = why.substr(why.find("] ") + 2);
+        RefuseDocument("not JSON: " + why.substr(0, 200));
+    }
+}
+
+}  // namespace tavoctl
