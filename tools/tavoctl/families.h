@@ -23,14 +23,15 @@ AddFamily AddQuota;
 AddFamily AddNet;
 AddFamily AddDiscover;
 AddFamily AddService;
+AddFamily AddState;
 AddFamily AddWatch;
 AddFamily AddError;
 AddFamily AddVersion;
 
 // In the order of the help text.
 inline constexpr AddFamily *families[] = {
-    AddConf, AddSection, AddLock,  AddProc, AddStorage,  AddVolume,  AddDisk,  AddPartition, AddRaid,    AddLvm,
-    AddUser, AddGroup,   AddQuota, AddNet,  AddDiscover, AddService, AddWatch, AddError,     AddVersion,
+    AddConf, AddSection, AddLock,  AddProc, AddStorage,  AddVolume,  AddDisk,  AddPartition, AddRaid,  AddLvm,
+    AddUser, AddGroup,   AddQuota, AddNet,  AddDiscover, AddService, AddState, AddWatch,     AddError, AddVersion,
 };
 
 }  // namespace tavoctl

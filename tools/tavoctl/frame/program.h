@@ -95,6 +95,8 @@ std::vector<std::string> Complete(const Program &program, std::vector<std::strin
 
 // The JSON Schema of a verb's answer, or of a failure for no verb.
 std::string SchemaOf(const Family *family, const VerbEntry *entry);
+// Of an object with some of these columns, at least the required ones.
+std::string SchemaOfRecord(const std::vector<ColumnFacts> &columns, const std::vector<std::string> &required);
 // Writes all of them into a folder, a file each: conf-get.json, error.json.
 void WriteSchemas(const Program &program, const std::string &folder);
 

@@ -97,6 +97,13 @@ Json ChangeSchema()
     schema["properties"]["diff"] = {{"type", "string"}, {"description", "of the file that the verb edits"}};
     for (const char *id : {"uid", "gid"})
         schema["properties"][id] = {{"type", "integer"}, {"description", "the id that was chosen"}};
+    const Json names = {{"type", "array"}, {"items", {{"type", "string"}}}};
+    for (const auto &[name, about] :
+         {std::pair("locked", "users that were created locked: the document has no hash of their password"),
+          std::pair("failed", "what could not be done; all else was")}) {
+        schema["properties"][name] = names;
+        schema["properties"][name]["description"] = about;
+    }
     return schema;
 }
 
@@ -187,6 +194,18 @@ std::string SchemaOf(const Family *family, const VerbEntry *entry)
     Json schema = {{"$schema", "http://json-schema.org/draft-07/schema#"}, {"title", title}};
     schema.update(entry ? SchemaOf(entry->answer) : FailureSchema());
     return schema.dump(2);
+}
+
+std::string SchemaOfRecord(const std::vector<ColumnFacts> &columns, const std::vector<std::string> &required)
+{
+    Json properties = Json::object();
+    for (const ColumnFacts &column : columns)
+        properties[column.name] = TypeOf(column);
+    return Json{{"type", "object"},
+                {"properties", std::move(properties)},
+                {"required", required},
+                {"additionalProperties", false}}
+        .dump();
 }
 
 void WriteSchemas(const Program &program, const std::string &folder)
