@@ -7,6 +7,7 @@
 #include "support/appliance_root.h"
 #include "support/container_text.h"
 #include "support/eventually.h"
+#include "support/rounds.h"
 #include "support/scratch_dir.h"
 #include "support/virtual_cable.h"
 
@@ -18,8 +19,11 @@
 #include <cstring>
 #include <ctime>
 #include <filesystem>
+#include <memory>
 #include <optional>
+#include <random>
 #include <set>
+#include <utility>
 
 #include <arpa/inet.h>
 #include <dlfcn.h>
@@ -38,6 +42,7 @@ using test::VirtualCable;
 using test::WriteFile;
 using testing::HasSubstr;
 using testing::IsEmpty;
+using testing::Not;
 using testing::UnorderedElementsAre;
 
 namespace {
@@ -172,6 +177,68 @@ TEST_F(Daemons, AreFoundFromTheInterfacesThatWork)
     }));
 }
 
+// Whatever the ports of the asker have on them: three others on the cable.
+TEST_F(Daemons, AreFoundByABoxWithTwoPorts)
+{
+    StartAll();
+    Node asker("asker");
+    ASSERT_EQ(asker.Shell("rm -f /etc/sysconfig/network-scripts/*"), 0);
+    VirtualCable second("second");
+    cable_->Plug(asker, "eth0");
+    second.Plug(asker, "eth1");
+    const auto all = UnorderedElementsAre("nas1(192.0.2.1)", "nas2(192.0.2.2)", "nas3(192.0.2.3)");
+    const auto found = [&](const char *cables, const auto &expected) {
+        ASSERT_EQ(asker.Shell(cables), 0) << cables;
+        EXPECT_TRUE(asker.Run([&] {
+            EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u);
+            int result = -1;
+            EXPECT_THAT(Discover(3, &result), expected);
+            EXPECT_EQ(result, 0) << "nothing has failed";
+            return true;
+        })) << cables;
+    };
+    // No cable: nobody answers, and nothing fails.
+    ASSERT_EQ(asker.Shell("ip link set eth0 down && ip link set eth1 down"), 0);
+    EXPECT_TRUE(asker.Run([] {
+        EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u);
+        int result = -1;
+        EXPECT_THAT(Discover(0, &result), IsEmpty());
+        EXPECT_EQ(result, 0);
+        return true;
+    }));
+    found("ifconfig eth0 192.0.2.9 netmask 255.255.255.0 up", all);
+    found("ip link set eth1 up", all);
+    // The cable is in the other port.
+    found("ifconfig eth0 0.0.0.0 down; ip link set eth0 name eth9 && ip link set eth1 name eth0 && "
+          "ip link set eth9 name eth1 && ifconfig eth1 192.0.2.9 netmask 255.255.255.0 up",
+          all);
+}
+
+TEST_F(Daemons, AreFoundByABondWithOneLeg)
+{
+    StartAll();
+    Node asker("asker");
+    if (asker.Shell("ip link add bond0 type bond 2>/dev/null") != 0)
+        GTEST_SKIP() << "this kernel has no bonds";
+    VirtualCable second("second");
+    second.Plug(asker, "eth0");
+    cable_->Plug(asker, "eth1");
+    ASSERT_EQ(asker.Shell("rm -f /etc/sysconfig/network-scripts/* && mount -o remount,rw /sys && "
+                          "cd /sys/class/net/bond0/bonding && echo active-backup >mode && echo 100 >miimon && "
+                          "echo +eth0 >slaves && echo +eth1 >slaves && "
+                          "ifconfig bond0 192.0.2.9 netmask 255.255.255.0 up"),
+              0);
+    ASSERT_EQ(ShellStatus("ip link set second0 down"), 0) << "the cable is cut";
+    EXPECT_TRUE(asker.Run([] {
+        EXPECT_TRUE(Eventually([] { return ReadFile("/sys/class/net/bond0/bonding/active_slave") == "eth1\n"; }));
+        int result = -1;
+        EXPECT_THAT(Discover(3, &result),
+                    UnorderedElementsAre("nas1(192.0.2.1)", "nas2(192.0.2.2)", "nas3(192.0.2.3)"));
+        EXPECT_EQ(result, 0);
+        return true;
+    }));
+}
+
 // What follows looks at the processes of the node in which it runs.
 std::string Status(const std::string &pid, const std::string &field)
 {
@@ -291,11 +358,11 @@ TEST_F(Daemons, ALockOfSomebodyElseIsInNobodysWay)
 
 class UdpSocket {
   public:
-    explicit UdpSocket(uint16_t port = 0)
+    explicit UdpSocket(uint16_t port = 0, const std::string &from = "0.0.0.0")
     {
         const int on = 1;
         ::setsockopt(fd_, SOL_SOCKET, SO_BROADCAST, &on, sizeof on);
-        const sockaddr_in here = Address("0.0.0.0", port);
+        const sockaddr_in here = Address(from.c_str(), port);
         EXPECT_EQ(::bind(fd_, reinterpret_cast<const sockaddr *>(&here), sizeof here), 0);
     }
     ~UdpSocket() { ::close(fd_); }
@@ -304,6 +371,16 @@ class UdpSocket {
     {
         const sockaddr_in where = Address(to, findhostd::kPort);
         ::sendto(fd_, bytes.data(), bytes.size(), 0, reinterpret_cast<const sockaddr *>(&where), sizeof where);
+    }
+
+    // How many packets have come.
+    size_t Waiting() const
+    {
+        char bytes[600];
+        size_t count = 0;
+        while (::recv(fd_, bytes, sizeof bytes, MSG_DONTWAIT) >= 0)
+            ++count;
+        return count;
     }
 
     // How many packets come until none has for half a second.
@@ -438,6 +515,175 @@ TEST_F(Daemons, OneHostDoesNotSilenceDiscovery)
             socket.Send("192.0.2.1", query);
             EXPECT_EQ(socket.Count(), 1u) << i;
         }
+        return true;
+    }));
+    ::kill(flooder, SIGKILL);
+    ::waitpid(flooder, nullptr, 0);
+}
+
+// Gives the node all addresses from 192.0.2.4 to 192.0.2.254, beside its own.
+void TakeManyAddresses(const Node &node)
+{
+    ASSERT_EQ(node.Shell("for net in 4/30 8/29 16/28 32/27 64/26 128/25; do "
+                         "ip route add local 192.0.2.$net dev lo table local || exit 1; done"),
+              0);
+}
+
+// A hostile host with 250 addresses.
+class Crowd {
+  public:
+    Crowd()
+    {
+        for (int i = 4; i < 254; ++i)
+            sockets_.push_back(std::make_unique<UdpSocket>(findhostd::kPort, "192.0.2." + std::to_string(i)));
+    }
+
+    // `pause` microseconds after each ten packets; what they are is random.
+    void Flood(int packets, int pause, std::mt19937 &random)
+    {
+        const std::string query(reinterpret_cast<const char *>(stFHOSTBroadCast), sizeof stFHOSTBroadCast);
+        for (int i = 0; i < packets; ++i) {
+            const size_t who = random() % sockets_.size();
+            const std::string own = "192.0.2." + std::to_string(who + 4);
+            std::string bytes = query;
+            switch (random() % 6) {
+            case 0:  // a forged length
+                bytes[8 + random() % (bytes.size() - 8)] = static_cast<char>(random());
+                break;
+            case 1:
+                bytes.resize(random() % 600, static_cast<char>(random()));
+                break;
+            case 2:
+                bytes = Reply(own.c_str(), "crowd" + std::to_string(random() % 1000));
+                break;
+            case 3:
+                bytes = Reply("192.0.2.2", "forged");
+                break;
+            }
+            sockets_[who]->Send("192.0.2.1", bytes);
+            if (i % 10 == 9)
+                Collect();
+            if (pause != 0 && i % 10 == 9)
+                ::usleep(static_cast<useconds_t>(pause));
+        }
+    }
+
+    // The most answers that one address has got, and all of them.
+    std::pair<size_t, size_t> Answers() const
+    {
+        size_t all = 0;
+        for (const size_t one : answers_)
+            all += one;
+        return {*std::max_element(answers_.begin(), answers_.end()), all};
+    }
+
+    // One address a call: its queue holds many.
+    void Collect()
+    {
+        next_ = (next_ + 1) % sockets_.size();
+        answers_[next_] += sockets_[next_]->Waiting();
+    }
+
+    size_t Size() const { return sockets_.size(); }
+
+  private:
+    std::vector<std::unique_ptr<UdpSocket>> sockets_;
+    std::vector<size_t> answers_ = std::vector<size_t>(250);
+    size_t next_ = 0;
+};
+
+int64_t Seconds()
+{
+    timespec now;
+    ::clock_gettime(CLOCK_MONOTONIC, &now);
+    return now.tv_sec;
+}
+
+// Packets that the node's processes have sent.
+long SentBy(const Node &node)
+{
+    return std::stol(node.Output("awk '$1 == \"Udp:\" { n = $5 } END { print n }' /proc/net/snmp"));
+}
+
+// Writable memory of both parts, in kB.
+long MemoryOf(const Node &node)
+{
+    return std::stol(node.Output("p=$(cat /var/run/findhostd.pid); cat /proc/$p/status "
+                                 "/proc/$(echo $(cat /proc/$p/task/$p/children))/status | "
+                                 "awk '$1 == \"VmData:\" { n += $2 } END { print n }'"));
+}
+
+TEST_F(Daemons, AMillionHostilePacketsCostNothing)
+{
+    ASSERT_EQ(nodes_[0]->Shell(kDaemon), 0);
+    TakeManyAddresses(*nodes_[1]);
+    const auto flood = [&](int packets, unsigned seed) {
+        EXPECT_TRUE(nodes_[0]->Run([] { return ErrFHOSTSendQueryPkt() == 0; }));  // from now on replies are listed
+        const long before = SentBy(*nodes_[0]);
+        const int64_t begin = Seconds();
+        EXPECT_TRUE(nodes_[1]->Run([&] {
+            Crowd crowd;
+            std::mt19937 random(seed);
+            crowd.Flood(packets, 0, random);
+            ::usleep(200000);
+            for (size_t i = 0; i < crowd.Size(); ++i)
+                crowd.Collect();
+            const auto seconds = static_cast<size_t>(Seconds() - begin + 2);
+            const auto [most, all] = crowd.Answers();
+            EXPECT_GE(all, seed == 1 ? 1u : 0u) << "the first ones of a second";
+            EXPECT_LE(most, 2 * seconds) << "to one address";
+            return true;
+        }));
+        EXPECT_LE(SentBy(*nodes_[0]) - before, 50 * (Seconds() - begin + 2) + 2) << "in all, and its own query";
+    };
+    const int packets = test::Rounds(1000000) / (std::getenv("TAVO_LONG_TESTS") ? 1 : 4);
+    flood(packets / 10, 1);
+    const long memory = MemoryOf(*nodes_[0]);
+    flood(packets - packets / 10, 2);
+    EXPECT_EQ(MemoryOf(*nodes_[0]), memory);
+    // Nobody speaks for another one, and it answers as ever.
+    EXPECT_TRUE(nodes_[0]->Run([] {
+        EXPECT_THAT(ListText(), Not(HasSubstr("forged")));
+        return true;
+    }));
+    EXPECT_TRUE(nodes_[2]->Run([] {
+        const UdpSocket socket(findhostd::kPort);
+        const std::string query(reinterpret_cast<const char *>(stFHOSTBroadCast), sizeof stFHOSTBroadCast);
+        EXPECT_TRUE(Eventually([&] {
+            socket.Send("192.0.2.1", query);
+            return socket.Count() > 0;
+        }));
+        return true;
+    }));
+}
+
+// It asks once a second, and is one of 251.
+TEST_F(Daemons, ACrowdDoesNotSilenceDiscovery)
+{
+    ASSERT_EQ(nodes_[0]->Shell(kDaemon), 0);
+    TakeManyAddresses(*nodes_[1]);
+    const pid_t flooder = ::fork();
+    if (flooder == 0) {
+        nodes_[1]->Run([&] {
+            Crowd crowd;
+            std::mt19937 random(3);
+            for (const int64_t end = Seconds() + 60; Seconds() < end;)
+                crowd.Flood(100, 5000, random);
+            return true;
+        });
+        ::_exit(0);
+    }
+    ::usleep(1000000);
+    EXPECT_TRUE(nodes_[2]->Run([] {
+        const UdpSocket socket(findhostd::kPort);
+        const std::string query(reinterpret_cast<const char *>(stFHOSTBroadCast), sizeof stFHOSTBroadCast);
+        size_t answers = 0;
+        for (int second = 0; second < 10 && answers == 0; ++second) {
+            socket.Send("192.0.2.1", query);
+            ::usleep(500000);
+            answers = socket.Count();
+        }
+        EXPECT_GE(answers, 1u);
         return true;
     }));
     ::kill(flooder, SIGKILL);
