@@ -215,6 +215,34 @@ TAVO_API int TAVOUserSetOne(const char *szOldName, const TAVOUSER *pUser);
 TAVO_API int TAVOUserSetPasswd(const TAVOUSER *const *rgpUser, const char *const *rgszHash,
                                const char *const *rgszLmHash, const char *const *rgszNtHash, int nUser);
 
+/* Locks the password of an account (fLocked not 0) or unlocks it. Locked, the hash in the shadow file has a "!" in front,
+ * which no password fits, and Samba's line has the flag "D" of a disabled account; unlocked, both are as before. Sessions
+ * that are open, keys of SSH and the credentials of the network backup service are not touched. A new password unlocks the
+ * account; every other change by TAVOUserSet leaves it locked. What is so already is a success.
+ * Returns 0, or -1 with nothing changed and
+ *   ERR_BAD_PARAMETERS    szName is NULL; or there is nothing to unlock: the account has no hash, or "*"
+ *   ERR_INVALID_USERNAME  the name cannot be converted
+ *   ERR_NO_SUCH_USER      there is no such local account, or it has no line in the shadow file
+ *   ERR_FORMAT_ERROR      a stored line has the wrong number of fields
+ * or as TAVOUserSet.
+ * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*,
+ *   /etc/.tavoaccount.commit
+ * Locks: TAVO_LOCK_USER (exclusive, at most 5 s) */
+TAVO_API int TAVOUserLockSet(const char *szName, int fLocked);
+
+/* Sets how long a password is valid, in days, 0 to 99999; -1 leaves a number as it is. nMin: days that must pass before
+ * the user may change it again; nMax: days after which it must be changed; nWarn: days before that on which the user is
+ * warned. TAVOUserSet, when it changes or renames the account, writes 0, 99999 and 7 again (100000 for nMin where
+ * fCannotChgPasswd is set), TAVOUserSetPasswd 7 for nWarn.
+ * Returns 0, or -1 with nothing changed and
+ *   ERR_BAD_PARAMETERS  szName is NULL; a number is out of range; nMax would not be above nMin; or nMin or nMax is given for
+ *                       an account that may not change its password, since that is what an nMin above nMax says
+ * or as TAVOUserLockSet.
+ * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*,
+ *   /etc/.tavoaccount.commit
+ * Locks: TAVO_LOCK_USER (exclusive, at most 5 s) */
+TAVO_API int TAVOUserAgingSet(const char *szName, int nMin, int nMax, int nWarn);
+
 /* Deletes the named users in one batch of nUser: their quotas, SMB connections, Samba and group entries and home
  * folders too. "root" and "admin" (any case) and NULL are refused with ERR_USER_DB_DELETE, that entry only; domain
  * names and names that do not exist are skipped. Returns 0, or -1 as TAVOUserSet.

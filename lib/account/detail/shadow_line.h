@@ -4,6 +4,7 @@
 
 #include <cstdint>
 #include <ctime>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -27,6 +28,26 @@ std::string FormatShadowLine(const ShadowLine &line, time_t now);
 // The same line with another hash; every other field is kept, except that the warning period becomes 7 days.
 // ERR_FORMAT_ERROR as above.
 int ReplaceShadowHash(std::string_view text, std::string_view hash, std::string &out);
+
+// Days; nothing: as before.
+struct ShadowAges {
+    std::optional<int32_t> least;
+    std::optional<int32_t> most;
+    std::optional<int32_t> warning;
+};
+
+// The same line with other ages. ERR_FORMAT_ERROR as above; ERR_BAD_PARAMETERS when the least age would reach the most, or
+// does and shall change: that is the flag of an account whose password is fixed.
+int ReplaceShadowAges(std::string_view text, const ShadowAges &ages, std::string &out);
+
+// The same line with a "!" before the hash, which no password fits, or without. ERR_FORMAT_ERROR as above; ERR_BAD_PARAMETERS
+// when there is nothing that could be unlocked: no hash, or "*".
+int ReplaceShadowLock(std::string_view text, bool locked, std::string &out);
+
+inline bool IsLockedHash(std::string_view hash)
+{
+    return hash.starts_with('!');
+}
 
 }  // namespace tavo
 

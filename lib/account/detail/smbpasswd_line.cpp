@@ -8,6 +8,11 @@
 #include <cstdio>
 
 namespace tavo {
+namespace {
+
+constexpr size_t kSmbFlags = 11;  // between the brackets, with blanks
+
+}  // namespace
 
 int ParseSmbpasswdLine(std::string_view text, SmbpasswdLine &line)
 {
@@ -24,6 +29,23 @@ std::string FormatSmbpasswdLine(const SmbpasswdLine &line)
 {
     return line.name + ':' + std::to_string(line.uid) + ':' + line.lm_hash + ':' + line.nt_hash + ':' + line.flags +
            ':' + line.changed + ':';
+}
+
+std::string WithDisabledFlag(std::string_view flags, bool disabled)
+{
+    std::string letters;
+    for (const char flag : flags)
+        if (flag != '[' && flag != ']' && flag != ' ' && flag != 'D')
+            letters += flag;
+    if (disabled)
+        letters.insert(letters.starts_with('N') ? 1 : 0, 1, 'D');  // the order in which Samba writes them
+    letters.resize(std::max(letters.size(), kSmbFlags), ' ');
+    return '[' + letters + ']';
+}
+
+bool HasDisabledFlag(std::string_view flags)
+{
+    return flags.find('D') != std::string_view::npos;
 }
 
 std::string SmbChangeTime(time_t now)

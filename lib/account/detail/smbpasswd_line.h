@@ -26,6 +26,10 @@ int ParseSmbpasswdLine(std::string_view text, SmbpasswdLine &line);
 
 std::string FormatSmbpasswdLine(const SmbpasswdLine &line);
 
+// The flags with the one of a disabled account ("D") set or cleared.
+std::string WithDisabledFlag(std::string_view flags, bool disabled);
+bool HasDisabledFlag(std::string_view flags);
+
 std::string SmbChangeTime(time_t now);              // the field `changed`
 std::string SmbHexHash(const unsigned char *hash);  // 16 bytes as 32 digits
 bool IsSmbHash(std::string_view text);              // 32 hexadecimal digits

@@ -64,6 +64,9 @@ int ChoosePassword(const char *password, const OldUser *old, const Hashing &hash
         hash = old->shadow.hash;
         smb.lm_hash = old->smb.lm_hash;
         smb.nt_hash = old->smb.nt_hash;
+        // A change of something else does not let a locked user in again.
+        if (IsLockedHash(hash) && HasDisabledFlag(old->smb.flags))
+            smb.flags = old->smb.flags;
         return 0;
     }
     if (hashing.method == HashMethod::kUnknown)

@@ -112,6 +112,19 @@ TEST(UserFiles, EveryChangeInTurn)
     EXPECT_EQ(test::DeleteUser("CAROL"), 0);
     EXPECT_EQ(test::DeleteUser("j\xC3\x9CRGEN m"), 0);
     ExpectFiles("5-deleted");
+
+    now += 86411;
+    EXPECT_EQ(TAVOUserAgingSet("bob", 1, 90, 14), 0);
+    EXPECT_EQ(TAVOUserLockSet("BOB", 1), 0);
+    EXPECT_EQ(TAVOUserLockSet("admin", 1), 0);
+    EXPECT_EQ(TAVOUserAgingSet("admin", -1, 365, -1), 0);
+    ExpectFiles("6-locked");
+
+    // A change of something else does not unlock.
+    now += 86411;
+    modified("bob", [](TAVOUSER &user) { user.szDesc = const_cast<char *>("away"); });
+    EXPECT_EQ(TAVOUserLockSet("admin", 0), 0);
+    ExpectFiles("7-unlocked");
 }
 
 // The system's own readers take every line, and a login with the password succeeds.

@@ -457,6 +457,85 @@ TEST(UserFollowUp, FoldersListsAndServices)
     EXPECT_EQ(test::ReadFile("/etc/rsyncd.secrets"), "other:secret\n");
 }
 
+// A locked account opens with its old password or a new one only; what cannot be done changes nothing.
+TEST(UserLock, RefusalsAndTheWayBack)
+{
+    ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
+    ASSERT_EQ(AddUser({.name = "fixed", .password = "x", .cannot_change = true}), 0);
+    const std::string open_shadow = LineOf("/etc/shadow", "alice");
+    const std::string open_samba = LineOf("/usr/tavo/etc/private/smbpasswd", "alice");
+    const auto before = AllFiles();
+    const struct {
+        int code;
+        std::function<int()> call;
+    } refusals[] = {
+        {ERR_BAD_PARAMETERS,
+         [] {
+             return TAVOUserLockSet(nullptr, 1);
+         }},
+        {ERR_NO_SUCH_USER,
+         [] {
+             return TAVOUserLockSet("ghost", 1);
+         }},
+        {ERR_NO_SUCH_USER,
+         [] {
+             return TAVOUserLockSet("DOM\\alice", 1);
+         }},
+        {ERR_BAD_PARAMETERS,
+         [] {
+             return TAVOUserLockSet("admin", 0);
+         }},  // "*" is not a hash
+        {ERR_NO_SUCH_USER,
+         [] {
+             return TAVOUserAgingSet("ghost", 0, 1, 1);
+         }},
+        {ERR_BAD_PARAMETERS,
+         [] {
+             return TAVOUserAgingSet("alice", 0, 100000, 1);
+         }},
+        {ERR_BAD_PARAMETERS,
+         [] {
+             return TAVOUserAgingSet("alice", -2, 90, 1);
+         }},
+        {ERR_BAD_PARAMETERS,
+         [] {
+             return TAVOUserAgingSet("alice", 90, 90, -1);
+         }},  // would fix the password
+        {ERR_BAD_PARAMETERS,
+         [] {
+             return TAVOUserAgingSet("alice", 99999, -1, -1);
+         }},
+        {ERR_BAD_PARAMETERS,
+         [] {
+             return TAVOUserAgingSet("fixed", 1, -1, -1);
+         }},  // would free it
+        {ERR_BAD_PARAMETERS,
+         [] {
+             return TAVOUserAgingSet("fixed", -1, 90, -1);
+         }},
+    };
+    for (const auto &refusal : refusals) {
+        TLIBErrSet(ERR_SUCCESS);
+        EXPECT_EQ(refusal.call(), -1) << &refusal - refusals;
+        EXPECT_EQ(TLIBErrGet(), refusal.code) << &refusal - refusals;
+    }
+    EXPECT_EQ(AllFiles(), before);
+
+    EXPECT_EQ(TAVOUserAgingSet("fixed", -1, -1, 14), 0);
+    EXPECT_EQ(GetUser("fixed")->fCannotChgPasswd, 1);
+    ASSERT_EQ(TAVOUserLockSet("alice", 1), 0);
+    ASSERT_EQ(TAVOUserLockSet("Alice", 1), 0);
+    EXPECT_EQ(GetUser("alice")->szPasswd[0], '!');
+    ASSERT_EQ(TAVOUserLockSet("alice", 0), 0);
+    EXPECT_EQ(LineOf("/etc/shadow", "alice"), open_shadow);
+    EXPECT_EQ(LineOf("/usr/tavo/etc/private/smbpasswd", "alice"), open_samba);
+
+    ASSERT_EQ(TAVOUserLockSet("alice", 1), 0);
+    ASSERT_EQ(test::SetUser("alice", MakeUser({.name = "alice", .password = "new"}).get()), 0);
+    EXPECT_EQ(GetUser("alice")->szPasswd[0], '$');
+    EXPECT_NE(LineOf("/usr/tavo/etc/private/smbpasswd", "alice").find("[U          ]"), std::string::npos);
+}
+
 TEST(UserSetPasswd, StoresOnlyWhatIsAHash)
 {
     ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);

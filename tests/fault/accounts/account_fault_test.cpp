@@ -243,6 +243,8 @@ constexpr Call kCalls[] = {
          return TAVOUserSetPasswd(users, hash, digits, digits, 1);
      },
      true},
+    {"lock user", [](Outcome &) { return TAVOUserLockSet("alice", 1); }, true},
+    {"age password", [](Outcome &) { return TAVOUserAgingSet("alice", 1, 90, 14); }, true},
     {"delete user", [](Outcome &) { return TAVOUserDelete(kAlice, 1); }, true},
     {"add group", [](Outcome &) { return SetGroup(nullptr, "crew"); }, true},
     {"rename group", [](Outcome &) { return SetGroup("staff", "crew"); }, true},

@@ -230,6 +230,7 @@ Family AccountFamily()
             // Users.
             CALL(BlTLIBIsUserName, kZeroFails | kNoCode, { run(f, "alice"); }),
             CALL(TAVOConfGetUserLimit, kAnswers, { run(f); }),
+            CALL(TAVOUserAgingSet, 0, { run(f, "alice", 1, 90, 14); }),
             CALL(TAVOUserAlloc, 0,
                  {
                      TAVOUSER *user = nullptr;
@@ -314,6 +315,7 @@ Family AccountFamily()
                      run(f, names, text, 64);
                  }),
             CALL(TAVOUserIsExpired, 0, { run(f, 1); }),
+            CALL(TAVOUserLockSet, 0, { run(f, "alice", 1); }),
             CALL(TAVOUserPrivilegeGet, 0, { run(f, "alice"); }),
             CALL(TAVOUserRandomNumMap2Seed, 0, { run(f, 1); }),
             CALL(TAVOUserRemoveTmpFiles, kAnswers, { run(f); }),

@@ -178,6 +178,9 @@ TEST_F(TavoctlAccounts, ReadingVerbsSayTheSameAsTheFiles)
                  {"cannot_change_password", false},
                  {"expires", "2037-01-31"},
                  {"expired", false},
+                 {"min_days", 0},
+                 {"max_days", 99999},
+                 {"warn_days", 7},
                  {"groups", {"users"}}};
     EXPECT_EQ(Shown({"user", "show", "Anna"}), anna);
     EXPECT_EQ(Shown({"user", "show", "--uid", std::to_string(uid)}), anna);
@@ -222,6 +225,11 @@ TEST_F(TavoctlAccounts, WhatIsRefusedChangesNothing)
         {{"user", "delete", "--yes", "anna", "Admin", "--system"}, 1, "ERR_USER_DB_DELETE"},
         {{"user", "delete", "--yes", "anna", "guest"}, 2, "--system"},
         {{"group", "delete", "--yes", "users", "--system"}, 2, "the primary group of"},
+        {{"user", "lock", "anna", "guest"}, 2, "--system"},
+        {{"user", "unlock", "anna", "admin", "--system"}, 2, "no password to go back to"},
+        {{"user", "aging", "anna"}, 2, "nothing to change"},
+        {{"user", "aging", "anna", "--min", "90", "--max", "90"}, 2, "--max must be above --min"},
+        {{"user", "aging", "berta", "--max", "90"}, 2, "fixed"},
         {{"group", "add", "sixteen letters!"}, 2, "ERR_INVALID_GROUPNAME"},
         {{"group", "add", "Users"}, 1, "ERR_GROUP_EXISTS"},
         {{"group", "add", "staff", "--members", "anna,nemo"}, 3, "nemo"},
@@ -292,6 +300,31 @@ TEST_F(TavoctlAccounts, UsersWhoAreAtWorkAreDeletedByForceOnly)
     EXPECT_THAT(ran.err, HasSubstr("the primary group of carla"));
     ExpectDone({"group", "delete", "--yes", "--force", "staff"});
     EXPECT_EQ(Line(groups, "staff"), "");
+}
+
+TEST_F(TavoctlAccounts, LocksAndAgesOutliveOtherChanges)
+{
+    const std::string hash = Fields(shadow, "anna").at(1);
+    ExpectDone({"user", "aging", "anna", "--min", "1", "--max", "90", "--warn", "14"});
+    ExpectDone({"user", "lock", "anna", "berta"});
+    ExpectDone({"user", "lock", "anna"});
+    ExpectDone({"user", "modify", "anna", "--description", "away"});
+    ExpectDone({"user", "rename", "anna", "anna2"});
+    EXPECT_EQ(Fields(shadow, "anna2").at(1), "!" + hash);
+    EXPECT_EQ(Fields(samba, "anna2").at(4), "[DU         ]");
+    const json user = Shown({"user", "show", "anna2"});
+    EXPECT_THAT((std::vector<json>{user.at("min_days"), user.at("max_days"), user.at("warn_days")}),
+                ElementsAre(1, 90, 14));
+    EXPECT_EQ(user.at("password"), "locked");
+
+    ExpectDone({"user", "unlock", "anna2", "berta"});
+    EXPECT_EQ(Fields(shadow, "anna2").at(1), hash);
+    EXPECT_EQ(Fields(samba, "anna2").at(4), "[U          ]");
+    EXPECT_TRUE(PasswordIs("anna2", "secret one"));
+    // The password of berta is fixed by her ages.
+    ExpectDone({"user", "aging", "berta", "--warn", "3"});
+    ExpectDone({"user", "modify", "berta", "--cannot-change-password", "no"});
+    EXPECT_EQ(Line(shadow, "berta").substr(Line(shadow, "berta").find(":0:99999:")), ":0:99999:3:::");
 }
 
 TEST_F(TavoctlAccounts, NamesThatMislead)

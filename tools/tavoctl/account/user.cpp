@@ -132,6 +132,22 @@ day, or takes the limit away. `user show` says whether an account has expired.
 tavoctl user expire anna 2027-01-31
 tavoctl user expire anna never)",
              UserExpire);
+    user.Add("lock", changes, Answer::Change(),
+             R"(Locks accounts: their passwords fit no more, neither at a login nor for
+Samba, and come back with unlock. Open sessions and SSH keys are not touched. A new password unlocks, too.
+
+tavoctl user lock anna berta)",
+             UserLock);
+    user.Add("unlock", changes, Answer::Change(), R"(Unlocks accounts with the passwords that they had.
+
+tavoctl user unlock anna)",
+             UserUnlock);
+    user.Add("aging", changes, Answer::Change(), R"(Sets how long a password is valid, in days; what is not given stays.
+`user show` shows the numbers.
+
+tavoctl user aging anna --max 90 --warn 14
+tavoctl user aging anna --min 0 --max 99999)",
+             UserAging);
     user.Add("import", changes, Answer::Change(), R"(Adds the accounts of a list in one batch, and with --update changes
 those that are there. The list is comma-separated values under a line of field names, or the JSON of export; the fields
 are those of export, and password in clear text. Only name is required. Everything is looked at before anything is

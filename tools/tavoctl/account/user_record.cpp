@@ -143,6 +143,7 @@ void SetUsers(const std::vector<UserChange> &changes, const std::string &attempt
         users.push_back(&records[i]);
         old_names.push_back(changes[i].old_name ? changes[i].old_name->c_str() : nullptr);
     }
+    const AgesByKey ages = ReadPasswordAges();
     TLIBErrSet(ERR_SUCCESS);
     const int result = TAVOUserSet(old_names.data(), users.data(), static_cast<int>(users.size()));
     Failure failure = LibraryFailure(attempted);
@@ -152,6 +153,8 @@ void SetUsers(const std::vector<UserChange> &changes, const std::string &attempt
     for (const UserChange &change : changes)
         if (!IsDone(change))
             refused.push_back(change.user.name);
+        else if (change.old_name)
+            RestoreAges(ages, *change.old_name, change.user.name);
     if (refused.empty())
         return;
     if (changes.size() > 1)

@@ -2,6 +2,7 @@
 #ifndef TAVOCTL_USER_RECORD_H
 #define TAVOCTL_USER_RECORD_H
 
+#include "account/password_ages.h"
 #include "frame/argument_kind.h"
 #include "frame/column.h"
 
@@ -89,6 +90,11 @@ inline constexpr Column<User> user_columns[] = {
      [](const User &u) {
          return TAVOUserIsExpired(u.expires) == 1;
      }},
+    {"min_days", [](const User &u) { return AgesOf(u.name).least; }, "before the password may be changed again",
+     in_one},
+    {"max_days", [](const User &u) { return AgesOf(u.name).most; }, "after which it must be changed", in_one},
+    {"warn_days", [](const User &u) { return AgesOf(u.name).warning; }, "before that on which the user is warned",
+     in_one},
     {"groups", [](const User &u) { return GroupsOf(u.name); }, "the groups that it is a member of", in_one},
 };
 

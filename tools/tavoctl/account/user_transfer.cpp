@@ -113,16 +113,19 @@ void StoreHashes(const std::vector<GivenHashes> &hashes, const std::string &atte
         nt.push_back(hashes[i].nt.c_str());
     }
     const int count = static_cast<int>(rows.size());
+    const AgesByKey ages = ReadPasswordAges();
     TLIBErrSet(ERR_SUCCESS);
     const int result = count ? TAVOUserSetPasswd(rows.data(), password.data(), lm.data(), nt.data(), count) : 0;
     Failure failure = LibraryFailure(attempted);
     if (result != 0)
         throw failure;
-    for (const GivenHashes &hash : hashes)
+    for (const GivenHashes &hash : hashes) {
         if (ReadUser(hash.name).password != hash.password) {
             failure.reason = "those of " + hash.name + " were refused";
             throw failure;
         }
+        RestoreAges(ages, hash.name, hash.name);
+    }
 }
 
 }  // namespace

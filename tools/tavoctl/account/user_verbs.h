@@ -79,6 +79,9 @@ Action UserAdd(Arguments &in);
 Action UserModify(Arguments &in);
 Action UserPasswd(Arguments &in);
 Action UserExpire(Arguments &in);
+Action UserLock(Arguments &in);
+Action UserUnlock(Arguments &in);
+Action UserAging(Arguments &in);
 Action UserImport(Arguments &in);
 Action UserExport(Arguments &in);
 

@@ -1,0 +1,90 @@
+// How long passwords are valid, and whether Samba lets an account in.
+#include "account/password_ages.h"
+
+#include "account/account_check.h"
+#include "account/account_key.h"
+#include "frame/failure.h"
+
+#include "tavo_user.h"
+
+#include <charconv>
+#include <fstream>
+#include <vector>
+
+namespace tavoctl {
+namespace {
+
+enum ShadowField : unsigned char { least_field = 3, most_field, warning_field, shadow_fields = 9 };
+enum SambaField : unsigned char { flags_field = 4, samba_fields = 7 };
+
+std::optional<int> DaysIn(const std::string &field)
+{
+    int days = 0;
+    const auto [stop, error] = std::from_chars(field.data(), field.data() + field.size(), days);
+    return error == std::errc() && stop == field.data() + field.size() ? std::optional(days) : std::nullopt;
+}
+
+}  // namespace
+
+bool PasswordAges::IsFixed() const
+{
+    return least && most && *most <= *least;
+}
+
+bool PasswordAges::IsUsual() const
+{
+    constexpr int usual_most = 99999;
+    constexpr int usual_warning = 7;
+    return warning == usual_warning && (IsFixed() || (least == 0 && most == usual_most));
+}
+
+AgesByKey ReadPasswordAges()
+{
+    AgesByKey ages;
+    std::ifstream in("/etc/shadow");
+    for (std::string line; std::getline(in, line);) {
+        const std::vector<std::string> fields = SplitFields(line);
+        if (fields.size() == shadow_fields)
+            ages.emplace(AccountKey(fields[0]), PasswordAges{DaysIn(fields[least_field]), DaysIn(fields[most_field]),
+                                                             DaysIn(fields[warning_field])});
+    }
+    return ages;
+}
+
+PasswordAges AgesOf(const std::string &user)
+{
+    const AgesByKey ages = ReadPasswordAges();
+    const auto found = ages.find(AccountKey(user));
+    return found == ages.end() ? PasswordAges{} : found->second;
+}
+
+void RestoreAges(const AgesByKey &before, const std::string &old_name, const std::string &name)
+{
+    const auto old = before.find(AccountKey(old_name));
+    if (old == before.end() || old->second.IsUsual())
+        return;
+    const PasswordAges now = AgesOf(name);
+    const bool fixed = old->second.IsFixed() || now.IsFixed();
+    const auto changed = [](std::optional<int> wanted, std::optional<int> present) {
+        return wanted && wanted != present ? *wanted : -1;
+    };
+    const int least = fixed ? -1 : changed(old->second.least, now.least);
+    const int most = fixed ? -1 : changed(old->second.most, now.most);
+    const int warning = changed(old->second.warning, now.warning);
+    if (least >= 0 || most >= 0 || warning >= 0)
+        Must(TAVOUserAgingSet(name.c_str(), least, most, warning) == 0,
+             "set the age of the password of " + name + " again");
+}
+
+std::string SambaState(const std::string &user)
+{
+    std::ifstream in("/usr/tavo/etc/private/smbpasswd");
+    for (std::string line; std::getline(in, line);) {
+        const std::vector<std::string> fields = SplitFields(line);
+        if (fields.size() == samba_fields && AccountKey(fields[0]) == AccountKey(user))
+            return fields[flags_field].find('D') == std::string::npos ? "on" : "disabled";
+    }
+    return "none";
+}
+
+}  // namespace tavoctl
