@@ -1,4 +1,5 @@
 // The user family: what is refused and what that leaves, names, ids, enumeration, expiry, hashes, follow-ups.
+#include "tavo_lock.h"
 #include "tavo_user.h"
 
 #include "account/user/user_fixture.h"
@@ -12,6 +13,7 @@
 
 #include <fcntl.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
 #include <syslog.h>
 #include <unistd.h>
 
@@ -534,6 +536,39 @@ TEST(UserLock, RefusalsAndTheWayBack)
     ASSERT_EQ(test::SetUser("alice", MakeUser({.name = "alice", .password = "new"}).get()), 0);
     EXPECT_EQ(GetUser("alice")->szPasswd[0], '$');
     EXPECT_NE(LineOf("/usr/tavo/etc/private/smbpasswd", "alice").find("[U          ]"), std::string::npos);
+}
+
+// A home of many files: once the stage is there and the locks are free, others go on while it is being removed.
+TEST(UserFollowUp, LocksAreFreeWhileAHomeIsRemoved)
+{
+    constexpr int files = 4000;
+    constexpr unsigned locks = TAVO_LOCK_USER | TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
+    test::WriteFile("/usr/tavo/etc/share.conf", "[homes]\npath=/volume1/homes\n");
+    std::filesystem::create_directories("/volume1/homes");
+    bool free_meanwhile = false;
+    for (int round = 0; round < 10 && !free_meanwhile; ++round) {
+        ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
+        std::filesystem::create_directories("/volume1/homes/alice");
+        for (int i = 0; i < files; ++i)
+            test::WriteFile("/volume1/homes/alice/" + std::to_string(i), "");
+        const pid_t pid = ::fork();
+        if (pid == 0)
+            ::_exit(test::DeleteUser("alice") == 0 ? 0 : 1);
+        const std::string stage = "/volume1/@tmp/@del_users_home_" + std::to_string(pid);
+        int status = 0;
+        pid_t ended = 0;
+        while ((ended = ::waitpid(pid, &status, WNOHANG)) == 0) {
+            if (::access(stage.c_str(), F_OK) != 0 ||
+                ErrTLIBFileLock(locks | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING, 0) != 0)
+                continue;
+            free_meanwhile |= ::access(stage.c_str(), F_OK) == 0;
+            EXPECT_EQ(ErrTLIBFileUnlock(locks), 0);
+        }
+        EXPECT_EQ(ended, pid);
+        EXPECT_EQ(status, 0);
+        EXPECT_NE(::access("/volume1/homes/alice", F_OK), 0);
+    }
+    EXPECT_TRUE(free_meanwhile);
 }
 
 TEST(UserSetPasswd, StoresOnlyWhatIsAHash)
