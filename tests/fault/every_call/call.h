@@ -24,17 +24,16 @@
 namespace every_call {
 
 enum : unsigned {
-    kZeroFails = 1,      // 0 is the failure: pointers apart, functions that answer yes or no
-    kNoCode = 2,         // the function has no codes, so a failure may leave none
-    kAnswers = 4,        // a failed step is an answer of its own: skipped in a list, "not running", nothing to clear up
-    kInChild = 8,        // changes its process, or ends it
-    kMayAbort = 16,      // without a pipe it aborts, as documented
-    kNoFaults = 32,      // waits or starts programs by design; faults inside have tests of their own
-    kCreates = 64,       // makes the file first and then writes to it
-    kHolds = 128,        // the process keeps what it opens and allocates
-    kLeavesCode = 256,   // succeeds without a failed step, and leaves its code
-    kSteps = 512,        // rewrites several files, or one file several times; each rewrite is whole
-    kClosesTwice = 1024  // builds stores; a close that fails makes Berkeley DB close twice, and die
+    kZeroFails = 1,     // 0 is the failure: pointers apart, functions that answer yes or no
+    kNoCode = 2,        // the function has no codes, so a failure may leave none
+    kAnswers = 4,       // a failed step is an answer of its own: skipped in a list, "not running", nothing to clear up
+    kInChild = 8,       // changes its process, or ends it
+    kMayAbort = 16,     // without a pipe it aborts, as documented
+    kNoFaults = 32,     // waits or starts programs by design; faults inside have tests of their own
+    kCreates = 64,      // makes the file first and then writes to it
+    kHolds = 128,       // the process keeps what it opens and allocates
+    kLeavesCode = 256,  // succeeds without a failed step, and leaves its code
+    kSteps = 512        // rewrites several files, or one file several times; each rewrite is whole
 };
 
 // The outcome of a call, in memory that it shares with the test.

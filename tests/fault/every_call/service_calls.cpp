@@ -154,8 +154,7 @@ Family ServiceFamily()
             STATUS(TAVOServiceTelnetStatus, "telnet"),
             CALL(TAVOServiceThirdPartyAll, kAnswers, { run(f, "start"); }),
             CALL(TAVOServiceTypeGet, 0, { run(f, 0); }),
-            CALL(TAVOServiceUserHome, kAnswers | kHolds | kClosesTwice,
-                 { run(f, Row("userhome"), int{TAVO_SERVICE_ENABLE}); }),
+            CALL(TAVOServiceUserHome, kAnswers | kHolds, { run(f, Row("userhome"), int{TAVO_SERVICE_ENABLE}); }),
             CALL(TAVOServiceVolumeChange, 0, { run(f, 2, kVolumes[1]); }),
             CALL(TAVOServiceVolumeGetbyLink, kAnswers,
                  {

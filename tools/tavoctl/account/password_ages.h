@@ -22,7 +22,7 @@ using AgesByKey = std::map<std::string, PasswordAges>;
 AgesByKey ReadPasswordAges();  // of every line of the shadow file
 PasswordAges AgesOf(const std::string &user);
 
-// Gives an account the ages again that it had under its old name: the library's other changes write the usual ones. Throws a
+// Restores the ages that an account had under its old name: the library's other changes write the usual ones. Throws a
 // Failure.
 void RestoreAges(const AgesByKey &before, const std::string &old_name, const std::string &name);
 
