@@ -41,6 +41,23 @@ class Watching {
         });
     }
 
+    // What it and the programs that it starts have used of the processor, in the kernel's ticks.
+    long Ticks() const
+    {
+        std::istringstream words(test::ReadFile("/proc/" + std::to_string(pid_) + "/stat"));
+        std::string word;
+        long ticks = 0;
+        for (int field = 1; words >> word; ++field)
+            ticks += field >= 14 && field <= 17 ? std::stol(word) : 0;
+        return ticks;
+    }
+
+    bool EndsWhenAsked() const
+    {
+        Shell("kill " + std::to_string(pid_));
+        return test::Eventually([&] { return !std::filesystem::exists("/proc/" + std::to_string(pid_)); });
+    }
+
     static constexpr char place[] = "/tmp/watched";
 
   private:
@@ -70,6 +87,12 @@ TEST(TavoctlWatch, TellsOfMountsServicesLinksAndAddresses)
     EXPECT_TRUE(watching.Tells("address-added", "lo", "10.9.8.7/24"));
     test::Told("ip addr del 10.9.8.7/24 dev lo");
     EXPECT_TRUE(watching.Tells("address-removed", "lo", "10.9.8.7/24"));
+
+    // Files that come and go beside the pid files, its own among them, are nothing to look at.
+    const long before = watching.Ticks();
+    test::Told("for i in 1 2 3 4 5 6 7 8 9 10; do : >/tmp/nothing$i; rm /tmp/nothing$i; sleep 0.1; done");
+    EXPECT_LE(watching.Ticks() - before, 5);
+    EXPECT_TRUE(watching.EndsWhenAsked());
 }
 
 TEST(TavoctlWatch, RunsAProgramForEachEvent)

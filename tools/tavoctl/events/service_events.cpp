@@ -5,8 +5,10 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <chrono>
 #include <map>
 #include <set>
+#include <string_view>
 
 #include <sys/inotify.h>
 #include <sys/syscall.h>
@@ -41,9 +43,11 @@ class ServiceSource : public EventSource {
         for (int id = 0; TAVOServiceNameGet(id); ++id) {
             const char *proc = TAVOServiceProcGet(id);
             const std::string path = proc ? proc : "";
-            if (const std::size_t slash = path.rfind('/'); slash != path.npos && slash > 0)
+            if (const std::size_t slash = path.rfind('/'); slash != path.npos && slash > 0) {
+                pid_files_.insert(path.substr(slash + 1));
                 ::inotify_add_watch(fd_, path.substr(0, slash).c_str(),
                                     IN_CREATE | IN_DELETE | IN_CLOSE_WRITE | IN_MOVED_TO | IN_MOVED_FROM);
+            }
         }
         Read();
     }
@@ -58,11 +62,13 @@ class ServiceSource : public EventSource {
         return wanted;
     }
 
+    // Of a service without a pid file nothing tells that it starts.
+    int Patience() const override { return static_cast<int>(look_interval.count()); }
+
     void Look(std::vector<Event> &events) override
     {
-        char bytes[4096];
-        while (::read(fd_, bytes, sizeof bytes) > 0)
-            ;
+        if (!SomeChanged() && std::chrono::steady_clock::now() < next_look_)
+            return;
         const std::map<std::string, pid_t> before = running_;
         Read();
         for (const auto &[name, pid] : before)
@@ -76,8 +82,31 @@ class ServiceSource : public EventSource {
     }
 
   private:
+    // Whether a pid file has changed or a process ended. Looking at services makes files in the same folders: by those
+    // alone they would be looked at again and again.
+    bool SomeChanged()
+    {
+        bool changed = false;
+        alignas(inotify_event) char bytes[4096];
+        for (ssize_t count; (count = ::read(fd_, bytes, sizeof bytes)) > 0;) {
+            const inotify_event *event = nullptr;
+            for (const char *at = bytes; at < bytes + count; at += sizeof *event + event->len) {
+                event = reinterpret_cast<const inotify_event *>(at);
+                const std::string_view name = event->len ? event->name : "";
+                changed =
+                    changed || (event->mask & IN_Q_OVERFLOW) || name.ends_with(".pid") || pid_files_.contains(name);
+            }
+        }
+        for (const auto &[name, end] : ends_) {
+            pollfd ended = {end->Get(), POLLIN, 0};
+            changed = changed || (ended.fd >= 0 && ::poll(&ended, 1, 0) > 0);
+        }
+        return changed;
+    }
+
     void Read()
     {
+        next_look_ = std::chrono::steady_clock::now() + look_interval;
         std::map<std::string, pid_t> now;
         for (int id = 0; TAVOServiceNameGet(id); ++id)
             if (const ServiceState state = StateOf(id, false); state.pid > 0)
@@ -92,7 +121,11 @@ class ServiceSource : public EventSource {
                 ends_[name] = std::make_unique<ProcessEnd>(pid);
     }
 
+    static constexpr std::chrono::milliseconds look_interval{2000};
+
     int fd_;
+    std::chrono::steady_clock::time_point next_look_{};
+    std::set<std::string, std::less<>> pid_files_;  // by their names alone
     std::map<std::string, pid_t> running_;
     std::map<std::string, std::unique_ptr<ProcessEnd>> ends_;
 };

@@ -71,7 +71,13 @@ class Requests {
         if (status != 0)
             Warn(words[0] + " ended with status " + std::to_string(status));
     }
-    static bool Asked() { return asked_ != 0; }
+    // One that came while something was ready still waits to be delivered.
+    static bool Asked()
+    {
+        sigset_t pending;
+        return asked_ != 0 || (::sigpending(&pending) == 0 &&
+                               (::sigismember(&pending, SIGINT) == 1 || ::sigismember(&pending, SIGTERM) == 1));
+    }
 
   private:
     static inline volatile std::sig_atomic_t asked_ = 0;
