@@ -197,7 +197,7 @@ TEST_F(Daemons, AreFoundByABoxWithTwoPorts)
             return true;
         })) << cables;
     };
-    // No cable: nobody answers, and nothing fails.
+    // No cable: there is no answer, and nothing fails.
     ASSERT_EQ(asker.Shell("ip link set eth0 down && ip link set eth1 down"), 0);
     EXPECT_TRUE(asker.Run([] {
         EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u);
@@ -521,7 +521,7 @@ TEST_F(Daemons, OneHostDoesNotSilenceDiscovery)
     ::waitpid(flooder, nullptr, 0);
 }
 
-// Gives the node all addresses from 192.0.2.4 to 192.0.2.254, beside its own.
+// Adds all addresses from 192.0.2.4 to 192.0.2.254 to those of the node.
 void TakeManyAddresses(const Node &node)
 {
     ASSERT_EQ(node.Shell("for net in 4/30 8/29 16/28 32/27 64/26 128/25; do "
@@ -641,7 +641,7 @@ TEST_F(Daemons, AMillionHostilePacketsCostNothing)
     const long memory = MemoryOf(*nodes_[0]);
     flood(packets - packets / 10, 2);
     EXPECT_EQ(MemoryOf(*nodes_[0]), memory);
-    // Nobody speaks for another one, and it answers as ever.
+    // No host speaks for another one, and each is answered.
     EXPECT_TRUE(nodes_[0]->Run([] {
         EXPECT_THAT(ListText(), Not(HasSubstr("forged")));
         return true;

@@ -33,7 +33,7 @@ class OpenStore {
     explicit operator bool() const { return db_; }
     TAVOBDB *Get() const { return db_; }
 
-    // Every entry that is no bookkeeping, without the NULs. Nothing when the walk does not reach the end.
+    // Every entry that is not bookkeeping, without the NULs. Nothing when the walk does not reach the end.
     std::optional<LinesByKey> Entries() const
     {
         LinesByKey entries;
@@ -61,7 +61,7 @@ bool IsAway(const char *path)
     return ::lstat(path, &state) != 0;
 }
 
-// The entries of a store, read from a copy: opening one as it lies there may repair it. Else a reason.
+// The entries of a store, read from a copy: opening one where it is may repair it. Else a reason.
 std::optional<LinesByKey> ReadStore(const char *path, std::string &reason)
 {
     struct stat state = {};

@@ -25,12 +25,12 @@ struct UserPlan {
     std::string path;  // of the list
     std::vector<UserChange> changes = {};
     std::vector<GivenHashes> hashes = {};
-    std::vector<std::string> locked = {};  // new ones that nobody can use until they have a password
+    std::vector<std::string> locked = {};  // new ones that cannot be used until they have a password
     int additions = 0;
 };
 
 // Looks at every row and notes in the call what differs; throws a Failure for what is refused. `password`: what the options
-// say for a new user whose row has none; nullptr: it is locked, and an empty hash is no password.
+// say for a new user whose row has none; nullptr: it is locked, and an empty hash is not a password.
 UserPlan PlanUsers(Call &call, const std::string &path, bool update, const std::vector<AccountRow> &rows,
                    const PasswordChoice *password);
 void CarryOut(const UserPlan &plan);
@@ -44,7 +44,7 @@ struct GroupPlan {
     std::vector<std::pair<std::optional<Group>, Group>> changes;
 };
 
-// `member_name`: the name of a member as its account has it; throws a Failure for one that is no user.
+// `member_name`: the name of a member as its account has it; throws a Failure for one that is not a user.
 GroupPlan PlanGroups(Call &call, const std::string &path, bool update, const std::vector<AccountRow> &rows,
                      const std::function<std::string(const std::string &)> &member_name);
 void CarryOut(const GroupPlan &plan);

@@ -200,7 +200,7 @@ void CarryOut(const NetPlan &plan, bool probe, const std::optional<int64_t> &tri
 {
     if (probe)
         RefuseUsedAddresses(plan.differences);
-    // A change that was cut off is no part of what this one goes back to.
+    // A change that was cut off does not belong to what this one goes back to.
     Must(TAVONetHostsRefresh() >= 0, "finish an earlier change");
     NetChange::Make(trial_seconds, [&] { MakeChange(plan.wanted); });
 }

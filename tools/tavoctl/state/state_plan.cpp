@@ -239,7 +239,7 @@ void StatePlan::SetSettings() const
 
 void StatePlan::SetAccounts() const
 {
-    // Nobody changes the accounts between the users and the groups.
+    // No other program changes the accounts between the users and the groups.
     const HeldLocks lock(TAVO_LOCK_USER | TAVO_LOCK_GROUP | TAVO_LOCK_SMB, false, usual_wait);
     AccountFiles files(users_);
     try {
