@@ -78,9 +78,10 @@ TEST(TavoctlWatch, TellsOfMountsServicesLinksAndAddresses)
     EXPECT_TRUE(watching.Tells("service-up", "crond", "pid "));
     test::Told("tavoctl service stop crond");
     EXPECT_TRUE(watching.Tells("service-down", "crond")) << test::ReadFile(Watching::place);
-    // One that dies at once leaves its pid file behind.
-    test::Told(": >/tmp/watched; tavoctl service start crond && kill -9 $(tavoctl service list --noheadings --output "
-               "name,pid | awk '$1 == \"crond\" { print $2 }')");
+    // One that is killed.
+    test::Told(": >/tmp/watched; tavoctl service start crond");
+    EXPECT_TRUE(watching.Tells("service-up", "crond", "pid "));
+    test::Told("kill -9 $(tavoctl service list --noheadings --output name,pid | awk '$1 == \"crond\" { print $2 }')");
     EXPECT_TRUE(watching.Tells("service-down", "crond")) << test::ReadFile(Watching::place);
 
     test::Told("ip link set lo up && ip addr add 10.9.8.7/24 dev lo");

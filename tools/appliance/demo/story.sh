@@ -6,7 +6,7 @@ set -eu
 export PATH=/usr/sbin:/usr/bin:/sbin:/bin:/usr/tavo/bin
 
 here=${0%/*}
-all='conf section lock proc error storage disk partition raid lvm volume user group quota net discover watch service'
+all='conf section lock proc error storage disk partition raid lvm volume user group quota net discover watch service state'
 
 say() { printf '\n\033[1m%s\033[0m\n' "$*"; }
 
@@ -35,7 +35,7 @@ if [ $# = 0 ]; then
     set -- $all
 fi
 # Without namespaces there is no /proc, and what is asked there cannot be shown.
-need_proc=' proc storage disk partition raid lvm volume quota net discover watch service '
+need_proc=' proc storage disk partition raid lvm volume quota net discover watch service state '
 left_out=
 for chapter; do
     case $need_proc in
