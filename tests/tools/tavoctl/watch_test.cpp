@@ -22,7 +22,7 @@ class Watching {
     explicit Watching(const std::string &options = {})
     {
         std::filesystem::remove(place);
-        pid_ = std::stoi(test::Told("tavoctl watch --json " + options + " >" + place + " 2>&1 & echo $!"));
+        pid_ = std::stoi(test::Told("tavoctl watch --json " + options + " >>" + place + " 2>&1 & echo $!"));
         ::usleep(500'000);
     }
     ~Watching() { Shell("kill " + std::to_string(pid_)); }
