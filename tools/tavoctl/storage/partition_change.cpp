@@ -48,13 +48,14 @@ int FlagsOf(bool system, bool data, const std::string &attempted)
 // Other systems have another tool of this name, so an installation keeps the appliance's own in a folder of its own.
 void RequireTool(const std::string &attempted)
 {
-    constexpr const char *kTool = "/sbin/sfdisk";
+    constexpr const char *partitioning_tool = "/sbin/sfdisk";
     struct stat in_place = {}, installed = {};
-    const bool missing = ::stat(kTool, &in_place) != 0;
+    const bool missing = ::stat(partitioning_tool, &in_place) != 0;
     const bool aside = ::stat("/usr/lib/tavo-appliance/sfdisk", &installed) == 0;
     if (missing || (aside && (in_place.st_ino != installed.st_ino || in_place.st_dev != installed.st_dev)))
         throw Failure{.attempted = attempted,
-                      .reason = std::string(kTool) + (missing ? " is missing" : " is not the appliance's own tool"),
+                      .reason = std::string(partitioning_tool) +
+                                (missing ? " is missing" : " is not the appliance's own tool"),
                       .hint = "run tavo-appliance-setup, of the package tavo-appliance"};
 }
 
