@@ -18,7 +18,7 @@
  * a directory that everybody may write to (/tmp), where writers refuse it with ERR_OPEN_FAILED; a hard link is cut. After
  * a failure the old file is as it was and the temporary file is gone. A new file has mode 0644, whatever the umask. The
  * codes of a rewrite are
- *   ERR_OPEN_FAILED     the file cannot be opened or is no regular file, or the temporary file cannot be created
+ *   ERR_OPEN_FAILED     the file cannot be opened or is not a regular file, or the temporary file cannot be created
  *   ERR_STAT_FAILED     the state of the open file cannot be read
  *   ERR_WRITE_FAILED    reading the old text or writing the new one failed (a full disk)
  *   ERR_RENAME_FAILED   the new file could not take the old one's place
@@ -44,7 +44,7 @@ TAVO_BEGIN_DECLS
  *   ERR_KEY_NOT_FOUND      no line sets the key
  * or -1 with szBuf untouched and
  *   ERR_BAD_PARAMETERS     szPath or szKey is NULL, flags is negative, or szBuf is NULL and cbBuf is not 0
- *   ERR_OPEN_FAILED        the file cannot be opened or is no regular file
+ *   ERR_OPEN_FAILED        the file cannot be opened or is not a regular file
  *   ERR_NOT_ENOUGH_MEMORY  the value needs more than cbBuf bytes
  *   ERR_READ_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileGetKeyValue(const char *szPath, const char *szKey, char *szBuf, int cbBuf, int flags);
@@ -78,7 +78,7 @@ TAVO_API int TLIBFileRemoveKey(const char *szPath, const char *szKey);
  * the wanted keys are, and the first line counts.
  * Returns the number of pairs in the hash, or -1 (the hash may hold a part of the pairs) with
  *   ERR_BAD_PARAMETERS  szPath, ppshHash, *ppshHash or szSep is NULL
- *   ERR_OPEN_FAILED     the file cannot be opened or is no regular file
+ *   ERR_OPEN_FAILED     the file cannot be opened or is not a regular file
  *   ERR_READ_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileGetKeys(const char *szPath, const TLIBSZLIST *pslKeys, TLIBSZHASH **ppshHash, const char *szSep);
 
@@ -100,7 +100,7 @@ TAVO_API int TLIBFileSetKeys(const char *szPath, const TLIBSZHASH *pshPairs, con
  *   ERR_KEY_NOT_FOUND      no such line
  * or -1 with szBuf untouched and
  *   ERR_BAD_PARAMETERS     szPath or szKey is NULL, lineNo is below 1, or szBuf is NULL and cbBuf is not 0
- *   ERR_OPEN_FAILED        the file cannot be opened or is no regular file
+ *   ERR_OPEN_FAILED        the file cannot be opened or is not a regular file
  *   ERR_NOT_ENOUGH_MEMORY  the line needs more than cbBuf bytes
  *   ERR_READ_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileGetLine(const char *szPath, int lineNo, char *szBuf, int cbBuf);

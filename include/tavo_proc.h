@@ -67,7 +67,7 @@ TAVO_API int TLIBTimedExec(int cSeconds, const char *szProgram, ...);
 
 /* Returns the process id in the pid file szPath; 0 when it holds no number; -1 with
  *   ERR_BAD_PARAMETERS  szPath is NULL
- *   ERR_OPEN_FAILED     the file cannot be opened, is no regular file, or is a symbolic link and the caller root */
+ *   ERR_OPEN_FAILED     the file cannot be opened, is not a regular file, or is a symbolic link and the caller root */
 TAVO_API pid_t TLIBReadPidFile(const char *szPath);
 
 /* Writes the caller's process id and a newline to szPath, creating the file (mode 0644, whatever the umask). Of an
@@ -76,7 +76,7 @@ TAVO_API pid_t TLIBReadPidFile(const char *szPath);
  * no second name.
  * Returns 0, or -1 with
  *   ERR_BAD_PARAMETERS  szPath is NULL
- *   ERR_OPEN_FAILED     the file cannot be created or opened, is no regular file or is not to be trusted
+ *   ERR_OPEN_FAILED     the file cannot be created or opened, is not a regular file or is not to be trusted
  *   ERR_WRITE_FAILED    the text could not be written */
 TAVO_API int TAVOProcPidFileCreate(const char *szPath);
 

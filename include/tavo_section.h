@@ -26,7 +26,7 @@ TAVO_BEGIN_DECLS
  * "[", while rewriting only takes real headers for the end of a section.
  * Returns the number of pairs in the hash, or -1 (the hash may hold a part of the pairs) with
  *   ERR_BAD_PARAMETERS  an argument or *ppshHash is NULL
- *   ERR_OPEN_FAILED     the file cannot be opened or is no regular file
+ *   ERR_OPEN_FAILED     the file cannot be opened or is not a regular file
  *   ERR_READ_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileGetSection(const char *szPath, const char *szSection, TLIBSZHASH **ppshHash);
 

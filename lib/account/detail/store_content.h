@@ -20,7 +20,7 @@ struct StoreContent {
 };
 
 // A whole text file and its modification time. A file that does not exist is empty, with the time 0. False when it
-// exists and cannot be read, or is no regular file.
+// exists and cannot be read, or is not a regular file.
 bool ReadTextFile(const char *path, std::string &text, int64_t &mtime);
 
 // The bytes of a 32-bit value of a reserved key.

@@ -27,7 +27,7 @@ std::string ServerText(const char *text)
     return ::inet_pton(AF_INET6, text, &address) == 1 ? text : "";
 }
 
-// The log tells which step failed; the old file stands whichever it was.
+// The log tells which step failed; the old file is unchanged whichever it was.
 void LogFailure(int code)
 {
     if (code == ERR_RENAME_FAILED)
