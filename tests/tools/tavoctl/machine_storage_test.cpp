@@ -3,18 +3,18 @@
 
 #include "support/machine.h"
 
-#include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
 
 namespace {
 
 using nlohmann::json;
+using test::IsRefused;
 using test::Ran;
 using test::Shell;
+using test::Succeeds;
 using test::Tavoctl;
 using test::Told;
 using test::Words;
-using testing::HasSubstr;
 
 class MachineTavoctl : public test::MachineTest {
   protected:
@@ -31,20 +31,6 @@ json Facts(Words words)
     const Ran ran = Tavoctl(words);
     EXPECT_EQ(ran.status, 0) << testing::PrintToString(words) << ran;
     return test::Facts(ran);
-}
-
-void Succeeds(const Words &words)
-{
-    const Ran ran = Tavoctl(words);
-    EXPECT_EQ(ran.status, 0) << testing::PrintToString(words) << ran;
-    EXPECT_EQ(ran.out + ran.err, "");
-}
-
-void IsRefused(const Words &words, const char *reason)
-{
-    const Ran ran = Tavoctl(words);
-    EXPECT_EQ(ran.status, 4) << testing::PrintToString(words) << ran;
-    EXPECT_THAT(ran.err, HasSubstr(reason)) << testing::PrintToString(words);
 }
 
 TEST_F(MachineTavoctl, ShowsTheDisks)

@@ -11,8 +11,10 @@
 namespace {
 
 using nlohmann::json;
+using test::IsRefused;
 using test::Ran;
 using test::Shell;
+using test::Succeeds;
 using test::Tavoctl;
 using test::Told;
 using test::Words;
@@ -32,20 +34,6 @@ json Facts(const Words &words)
     const Ran ran = Tavoctl(words);
     EXPECT_EQ(ran.status, 0) << testing::PrintToString(words) << ran;
     return test::Facts(ran);
-}
-
-void Does(const Words &words)
-{
-    const Ran ran = Tavoctl(words);
-    EXPECT_EQ(ran.status, 0) << testing::PrintToString(words) << ran;
-    EXPECT_EQ(ran.out + ran.err, "");
-}
-
-void Refuses(const Words &words, int status, const char *reason)
-{
-    const Ran ran = Tavoctl(words);
-    EXPECT_EQ(ran.status, status) << testing::PrintToString(words) << ran;
-    EXPECT_THAT(ran.err, HasSubstr(reason)) << testing::PrintToString(words);
 }
 
 void PlugLarge(int count)
@@ -72,9 +60,9 @@ std::string DiskInBay(const std::string &bay)
 TEST_F(MachineVolumes, ThreeCommandsFromBlankDisksToAVolumeThatOutlivesADisk)
 {
     PlugLarge(4);
-    Does({"partition", "create", "--yes", "sda", "sdb", "sdc", "sdd"});
-    Does({"raid", "create", "--yes", "--level", "5", "--no-sync", "md2", "sda3", "sdb3", "sdc3", "sdd3"});
-    Does({"volume", "create", "--yes", "1", "md2"});
+    Succeeds({"partition", "create", "--yes", "sda", "sdb", "sdc", "sdd"});
+    Succeeds({"raid", "create", "--yes", "--level", "5", "--no-sync", "md2", "sda3", "sdb3", "sdc3", "sdd3"});
+    Succeeds({"volume", "create", "--yes", "1", "md2"});
     const std::string sum = Told("head -c 8M /dev/urandom >/volume1/data && sync && sha256sum </volume1/data");
 
     json tree = Facts({"storage", "--json"});
@@ -83,9 +71,9 @@ TEST_F(MachineVolumes, ThreeCommandsFromBlankDisksToAVolumeThatOutlivesADisk)
     EXPECT_EQ(Named(tree, "name", "md2").at("parents"), json({"sda3", "sdb3", "sdc3", "sdd3"}));
     EXPECT_EQ(Named(tree, "name", "/dev/vg1/lv").at("mount"), "/volume1");
     EXPECT_EQ(Named(tree, "name", "/dev/vg1/lv").at("filesystem"), "ext4");
-    Refuses({"volume", "create", "--yes", "1", "sde"}, 4, "is mounted there");
-    Refuses({"volume", "create", "--yes", "2", "md2"}, 4, "/dev/md2 belongs to the volume vg1-lv");
-    Refuses({"volume", "check", "1"}, 4, "it is mounted on /volume1");
+    IsRefused({"volume", "create", "--yes", "1", "sde"}, "is mounted there");
+    IsRefused({"volume", "create", "--yes", "2", "md2"}, "/dev/md2 belongs to the volume vg1-lv");
+    IsRefused({"volume", "check", "1"}, "it is mounted on /volume1");
 
     // Pulled while it is written to: the bay, the array and its member are named, and the new disk takes the place.
     test::Happen("pull 3");
@@ -95,16 +83,16 @@ TEST_F(MachineVolumes, ThreeCommandsFromBlankDisksToAVolumeThatOutlivesADisk)
     const json bay = Named(Facts({"disk", "list", "--json"}), "bay", "3");
     EXPECT_EQ(bay.at("state"), "pulled");
     EXPECT_EQ(bay.at("role"), json({"md2"}));
-    Refuses({"raid", "replace", "--yes", "md2", "sdb3", "sde"}, 4, "/dev/sdb3 is in sync");
-    Refuses({"raid", "replace", "--yes", "md2", "sdb"}, 4, "is a member already");
-    Refuses({"raid", "replace", "--yes", "md2", "sde"}, 1, "take a larger one");
+    IsRefused({"raid", "replace", "--yes", "md2", "sdb3", "sde"}, "/dev/sdb3 is in sync");
+    IsRefused({"raid", "replace", "--yes", "md2", "sdb"}, "is a member already");
+    IsRefused({"raid", "replace", "--yes", "md2", "sde"}, "take a larger one", 1);
     test::Happen("plug 3 --blank 4800");
     const std::string disk = DiskInBay("3");
     EXPECT_NE(disk, "sdc") << "md2 still has that name";
-    Does({"raid", "replace", "--yes", "--wait", "md2", disk});
+    Succeeds({"raid", "replace", "--yes", "--wait", "md2", disk});
     EXPECT_EQ(Facts({"raid", "list", "--json"}).at(0).at("status"), "normal");
-    Does({"raid", "speed", "--most", "500000", "md2"});
-    Does({"raid", "scrub", "--wait", "md2"});
+    Succeeds({"raid", "speed", "--most", "500000", "md2"});
+    Succeeds({"raid", "scrub", "--wait", "md2"});
     EXPECT_EQ(Facts({"raid", "info", "--json", "md2"}).at("mismatches"), 0);
     EXPECT_EQ(Facts({"raid", "info", "--json", "md2"}).at("most_speed"), 500000);
     Told("echo 3 >/proc/sys/vm/drop_caches");
@@ -112,31 +100,31 @@ TEST_F(MachineVolumes, ThreeCommandsFromBlankDisksToAVolumeThatOutlivesADisk)
 
     // Everything stopped, as after a start of the system.
     const int open_file = ::open("/volume1/data", O_RDONLY | O_CLOEXEC);
-    Refuses({"volume", "unmount", "1"}, 4, "programs have files open there");
+    IsRefused({"volume", "unmount", "1"}, "programs have files open there");
     ::close(open_file);
-    Does({"volume", "unmount", "1"});
+    Succeeds({"volume", "unmount", "1"});
     EXPECT_EQ(Facts({"volume", "check", "--json", "1"}).at("state"), "clean");
-    Does({"raid", "stop", "--yes", "md2"});
+    Succeeds({"raid", "stop", "--yes", "md2"});
     const json stopped = Facts({"raid", "list", "--all", "--json"});
     ASSERT_EQ(stopped.size(), 1u);
     EXPECT_EQ(stopped[0].at("array"), "md2");
     EXPECT_EQ(stopped[0].at("status"), "stopped");
     EXPECT_EQ(stopped[0].at("members").size(), 4u);
-    Does({"raid", "assemble", "--all"});
+    Succeeds({"raid", "assemble", "--all"});
     EXPECT_EQ(Facts({"raid", "assemble", "--all", "--json"}).at("changed"), false);
-    Does({"volume", "mount", "--all"});
+    Succeeds({"volume", "mount", "--all"});
     EXPECT_EQ(Facts({"volume", "mount", "--json", "1"}).at("changed"), false);
     EXPECT_EQ(Told("sha256sum </volume1/data"), sum);
 }
 
 TEST_F(MachineVolumes, AVolumeGrowsWithItsArray)
 {
-    Does({"raid", "create", "--yes", "--level", "1", "--size", "40", "--no-sync", "md2", "sda", "sdb"});
-    Does({"volume", "create", "--yes", "3", "md2"});
+    Succeeds({"raid", "create", "--yes", "--level", "1", "--size", "40", "--no-sync", "md2", "sda", "sdb"});
+    Succeeds({"volume", "create", "--yes", "3", "md2"});
     EXPECT_EQ(Facts({"volume", "grow", "--json", "3"}).at("changed"), false);
     const uint64_t before = Facts({"volume", "list", "--json"}).at(0).at("capacity");
     Told("echo x >/volume3/file && mdadm -q --grow /dev/md2 --size=max --assume-clean");
-    Does({"volume", "grow", "3"});
+    Succeeds({"volume", "grow", "3"});
     EXPECT_GT(Facts({"volume", "list", "--json"}).at(0).at("capacity"), before * 2);
     EXPECT_EQ(Told("cat /volume3/file"), "x\n");
     EXPECT_EQ(Facts({"volume", "grow", "--json", "3"}).at("changed"), false);
@@ -144,18 +132,18 @@ TEST_F(MachineVolumes, AVolumeGrowsWithItsArray)
 
 TEST_F(MachineVolumes, WhatCannotBeStartedSafelyIsSaidAndForcedOnRequest)
 {
-    Does({"raid", "create", "--yes", "--level", "5", "--no-sync", "md2", "sda", "sdb", "sdc"});
+    Succeeds({"raid", "create", "--yes", "--level", "5", "--no-sync", "md2", "sda", "sdb", "sdc"});
     Told("dd if=/dev/urandom of=/dev/md2 bs=64k count=16 oflag=direct");
     // Two of three, one of them behind: it had failed before the last writes.
     Told("mdadm -q /dev/md2 --fail /dev/sdc && dd if=/dev/urandom of=/dev/md2 bs=64k count=16 oflag=direct");
-    Does({"raid", "stop", "--yes", "md2"});
+    Succeeds({"raid", "stop", "--yes", "md2"});
     test::Happen("pull 2");
     const Ran all = Tavoctl({"raid", "assemble", "--all"});
     EXPECT_EQ(all.status, 1) << all;
     EXPECT_THAT(all.err, HasSubstr("/dev/md2 is not started: only 1 of 3 members are there and up to date, and it "
                                    "takes 2"));
     EXPECT_EQ(Facts({"raid", "list", "--json"}), json::array());
-    Refuses({"raid", "assemble", "md2"}, 1, "--force says what may be lost");
+    IsRefused({"raid", "assemble", "md2"}, "--force says what may be lost", 1);
     const Ran asked = Tavoctl({"raid", "assemble", "--force", "md2"});
     EXPECT_EQ(asked.status, 2) << asked;
     EXPECT_THAT(asked.err, testing::ContainsRegex("/dev/sda: slot 0, [0-9]+ events"));
@@ -168,12 +156,12 @@ TEST_F(MachineVolumes, WhatCannotBeStartedSafelyIsSaidAndForcedOnRequest)
 TEST_F(MachineVolumes, WatchTellsOfDisksAndArrays)
 {
     const std::string pid = Told("tavoctl watch --json >/tmp/watched 2>&1 & echo $! && sleep 3");
-    Does({"raid", "create", "--yes", "--level", "1", "--no-sync", "md4", "sda", "sdb"});
+    Succeeds({"raid", "create", "--yes", "--level", "1", "--no-sync", "md4", "sda", "sdb"});
     test::Happen("pull 2");
     Told("dd if=/dev/urandom of=/dev/md4 bs=64k count=1 oflag=direct");
     EXPECT_TRUE(test::Comes([] { return Facts({"raid", "list", "--json"}).at(0).at("status") == "degraded"; }));
     test::Happen("plug 2 --blank");
-    Does({"raid", "replace", "--yes", "--wait", "md4", DiskInBay("2")});
+    Succeeds({"raid", "replace", "--yes", "--wait", "md4", DiskInBay("2")});
     const char *const expected[] = {
         R"("event":"array-started","object":"md4")",
         R"("event":"disk-out","object":"sdb","detail":"bay 2")",

@@ -43,6 +43,22 @@ Ran AsNobody(const Start &start)
     return ran;
 }
 
+// A verb that has nothing to say when it is done.
+inline void Succeeds(const Words &words)
+{
+    const Ran ran = Tavoctl(words);
+    EXPECT_EQ(ran.status, 0) << testing::PrintToString(words) << ran;
+    EXPECT_EQ(ran.out + ran.err, "");
+}
+
+// Busy unless another status is given.
+inline void IsRefused(const Words &words, const char *reason, int status = 4)
+{
+    const Ran ran = Tavoctl(words);
+    EXPECT_EQ(ran.status, status) << testing::PrintToString(words) << ran;
+    EXPECT_NE(ran.err.find(reason), std::string::npos) << testing::PrintToString(words) << ran;
+}
+
 struct Answer {
     std::string prompt;  // once this is shown
     std::string typed;   // the person types that
