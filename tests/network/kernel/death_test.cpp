@@ -432,7 +432,8 @@ TEST_P(AnyChange, FailsAtAnySystemCall)
                     return;
             }
         }
-        EXPECT_GT(failed, 0u);
+        // Of a sample, every one may be an error that the change can do without.
+        EXPECT_TRUE(failed > 0 || Stride() > 1);
     });
 }
 
