@@ -6,6 +6,7 @@
 
 #include "account/user/user_fixture.h"
 #include "support/captured_log.h"
+#include "support/domain_entries.h"
 
 #include <gtest/gtest.h>
 
@@ -18,33 +19,6 @@
 namespace {
 
 constexpr char kUser[] = "DOM\\eva";
-
-void Put(const char *store, std::string key, std::string value)
-{
-    TAVOBDB *db = TAVOBDbOpen(store, O_RDWR, 1);
-    ASSERT_TRUE(db) << store;
-    EXPECT_EQ(TAVOBDbSet(db, key.c_str(), static_cast<int>(key.size()) + 1, value.c_str(),
-                         static_cast<int>(value.size()) + 1),
-              0);
-    EXPECT_EQ(TAVOBDbClose(db), 0);
-}
-
-// As the domain's client does, so many seconds ago.
-void Refresh(int age)
-{
-    ASSERT_TRUE(test::GetUser("root"));
-    ASSERT_GE(TAVOGroupTotalNum(TAVO_GROUP_LOCAL), 0);
-    Put(TAVO_USER_DB_NAME, "DOM\\EVA", "DOM\\eva:x:70001:70000:Eva:/home/eva:/bin/sh");
-    Put(TAVO_USER_DB_UID, "070001", "DOM\\EVA");
-    Put(TAVO_GROUP_DB_NAME, "DOM\\CREW", "DOM\\crew:x:70000:DOM\\eva");
-    for (const char *store : {TAVO_USER_DB_NAME, TAVO_GROUP_DB_NAME}) {
-        TAVOBDB *db = TAVOBDbOpen(store, O_RDWR, 1);
-        ASSERT_TRUE(db);
-        const int32_t time = static_cast<int32_t>(std::time(nullptr)) - age;
-        EXPECT_EQ(TAVOBDbSet(db, TAVO_BDB_KEY_EXPIRE, TAVO_BDB_KEY_EXPIRE_LEN, &time, sizeof time), 0);
-        EXPECT_EQ(TAVOBDbClose(db), 0);
-    }
-}
 
 void ExpectReadLikeOthers()
 {
@@ -72,7 +46,7 @@ void SomebodyEditsTheFiles()
 
 TEST(DomainAccounts, AreReadLikeOthersAndOutliveARebuildWhileFresh)
 {
-    ASSERT_NO_FATAL_FAILURE(Refresh(200));
+    ASSERT_NO_FATAL_FAILURE(test::PutDomainEntries(200));
     ASSERT_NO_FATAL_FAILURE(ExpectReadLikeOthers());
     SomebodyEditsTheFiles();
     ASSERT_TRUE(test::GetUser("ext"));
@@ -89,7 +63,7 @@ TEST(DomainAccounts, AreReadLikeOthersAndOutliveARebuildWhileFresh)
 
 TEST(DomainAccounts, GoWithARebuildWhenStale)
 {
-    ASSERT_NO_FATAL_FAILURE(Refresh(310));
+    ASSERT_NO_FATAL_FAILURE(test::PutDomainEntries(310));
     ASSERT_TRUE(test::GetUser(kUser));
     SomebodyEditsTheFiles();
     EXPECT_FALSE(test::GetUser(kUser));

@@ -1,6 +1,7 @@
 // tavoctl user, group and quota: what becomes of the files, and what is refused before anything does.
 #include "run_tavoctl.h"
 
+#include "support/domain_entries.h"
 #include "support/eventually.h"
 #include "support/scratch_dir.h"
 
@@ -423,6 +424,16 @@ TEST_F(TavoctlAccounts, ExportedAccountsComeBackAsTheyWere)
     // Without being asked for them nobody gets the hashes.
     EXPECT_THAT(Tavoctl({"user", "export"}).out, AllOf(HasSubstr("anna"), Not(HasSubstr("$1$"))));
     EXPECT_THAT(Tavoctl({"user", "export", "--json"}).out, AllOf(HasSubstr("anna"), Not(HasSubstr("hash"))));
+}
+
+// Their controller keeps them: a list with them could not be imported.
+TEST_F(TavoctlAccounts, AccountsOfADomainAreShownAndNotExported)
+{
+    ASSERT_NO_FATAL_FAILURE(test::PutDomainEntries(0));
+    for (const char *family : {"user", "group"}) {
+        EXPECT_THAT(Tavoctl({family, "list"}).out, HasSubstr("DOM")) << family;
+        EXPECT_THAT(Tavoctl({family, "export"}).out, Not(HasSubstr("DOM"))) << family;
+    }
 }
 
 TEST_F(TavoctlAccounts, ImportIsOneBatch)

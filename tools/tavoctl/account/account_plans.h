@@ -35,6 +35,9 @@ UserPlan PlanUsers(Call &call, const std::string &path, bool update, const std::
                    const PasswordChoice *password);
 void CarryOut(const UserPlan &plan);
 
+// Without the accounts of a domain, which its controller keeps.
+std::vector<User> LocalUsers();
+
 // The accounts as export writes them.
 Table ExportedUsers(const std::vector<User> &users, bool hashes);
 

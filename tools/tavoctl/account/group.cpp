@@ -155,7 +155,7 @@ Action GroupExport(Arguments &in)
     const auto path = in.Option("--output", "PATH", file_path, "a new file that only root can read (standard output)");
     return [=](Call &call) {
         std::vector<Group> groups = GroupKind::All({}, {});
-        std::erase_if(groups, IsSystemGroup);
+        std::erase_if(groups, [](const Group &group) { return group.domain || IsSystemGroup(group); });
         Export(call, call.TableOf(group_export_columns, groups), *path);
     };
 }

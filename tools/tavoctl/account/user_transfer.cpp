@@ -182,6 +182,13 @@ void CarryOut(const UserPlan &plan)
     }
 }
 
+std::vector<User> LocalUsers()
+{
+    std::vector<User> users = UserKind::All({}, {});
+    std::erase_if(users, [](const User &user) { return user.kind == TAVO_USER_KIND_DOMAIN; });
+    return users;
+}
+
 Table ExportedUsers(const std::vector<User> &users, bool hashes)
 {
     const auto samba = hashes ? ReadSambaHashes() : std::map<std::string, SambaHashes>();
@@ -210,7 +217,7 @@ Action UserExport(Arguments &in)
     const auto hashes = in.Flag("--hashes", "with the hashes of the passwords");
     const auto path = in.Option("--output", "PATH", file_path, "a new file that only root can read (standard output)");
     return [=](Call &call) {
-        Export(call, ExportedUsers(UserKind::All({}, {}), *hashes), *path);
+        Export(call, ExportedUsers(LocalUsers(), *hashes), *path);
     };
 }
 

@@ -89,13 +89,6 @@ std::vector<SavedService> AllServices()
     return services;
 }
 
-StateJson LocalUsers(bool secrets)
-{
-    std::vector<User> users = UserKind::All({}, {});
-    std::erase_if(users, [](const User &user) { return user.kind == TAVO_USER_KIND_DOMAIN; });
-    return Items(ExportedUsers(users, secrets));
-}
-
 StateJson LocalGroups(const Call &call)
 {
     std::vector<Group> groups = AllGroups();
@@ -168,7 +161,7 @@ StateJson ReadState(const Call &call, const Sections &sections, bool secrets)
             state[name] = read();
     };
     add("settings", SettingsJson);
-    add("users", [&] { return LocalUsers(secrets); });
+    add("users", [&] { return Items(ExportedUsers(LocalUsers(), secrets)); });
     add("groups", [&] { return LocalGroups(call); });
     add("network", [] { return StateJson::parse(JsonOf(StoredNet())); });
     add("quotas", [&] { return Items(call.TableOf(saved_quota_columns, AllQuotas())); });
