@@ -166,6 +166,26 @@ TEST_F(TavoctlStateOfABox, ComesBackOnAFreshOneAndThenChangesNothing)
     }));
 }
 
+// Somebody changed the address by hand and forgot the router.
+TEST_F(TavoctlStateOfABox, AStoredGatewayOutOfReachIsShownAndNotRefused)
+{
+    EXPECT_TRUE(Box("here")->Run([] {
+        for (const auto &[address, status] : {std::pair("192.0.2.10/24", 0), std::pair("198.51.100.10/24", 2)}) {
+            json network = {{"format_version", 1}, {"gateway", "192.0.2.1"}};
+            network["cards"] = json::array({{{"name", "eth0"}, {"address", address}}});
+            const Ran ran = Apply(json{{"network", network}});
+            EXPECT_EQ(ran.status, status) << ran;
+        }
+        test::ShellStatus("sed -i s/192[.]0[.]2[.]1$/203.0.113.1/ /etc/sysconfig/network");
+        EXPECT_EQ(Shown().at("network").at("gateway"), "203.0.113.1");
+        WriteFile(kFile, Tavoctl({"state", "show"}).out);
+        const Ran differs = Tavoctl({"state", "diff", kFile});
+        EXPECT_EQ(differs.status, 1) << differs;
+        EXPECT_THAT(differs.out, testing::ContainsRegex("gateway +192.0.2.1 +203.0.113.1")) << "in use, and stored";
+        return !HasFailure();
+    }));
+}
+
 TEST_F(TavoctlStateOfABox, AServiceWhoseVolumeIsAwayIsTheOnlyOneLeftOut)
 {
     EXPECT_TRUE(Box("here")->Run([] {

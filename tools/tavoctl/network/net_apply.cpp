@@ -62,6 +62,33 @@ std::vector<NetDifference> DifferencesTo(const NetDocument &wanted)
     return differences;
 }
 
+bool IsOnNetworkOf(const NetFactsMap &card, const std::string &gateway)
+{
+    std::vector<std::string> all = TextsOf(card, "more_addresses");
+    all.push_back(TextOf(card, "address"));
+    return TextOf(card, "mode") == "dhcp" ||
+           std::any_of(all.begin(), all.end(), [&](const std::string &one) { return IsInNetwork(gateway, one); });
+}
+
+// A gateway that no card reaches today either, and that the document only repeats, is not the document's fault.
+void RefuseLostGateway(const NetDocument &wanted, const NetDocument &stored)
+{
+    const std::string gateway = TextOf(wanted.net, "gateway");
+    std::map<std::string, NetFactsMap> after = stored.cards;
+    for (const auto &[name, card] : wanted.cards)
+        if (card.contains("mode") || !after.contains(name))
+            after[name] = card;
+    for (const std::string &name : wanted.absent)
+        after.erase(name);
+    const auto reached = [&](const std::map<std::string, NetFactsMap> &cards) {
+        return std::any_of(cards.begin(), cards.end(),
+                           [&](const auto &card) { return IsOnNetworkOf(card.second, gateway); });
+    };
+    if (gateway.empty() || reached(after) || (gateway == TextOf(stored.net, "gateway") && !reached(stored.cards)))
+        return;
+    throw UsageFailure("take the document", "gateway: " + gateway + " is on the network of no card");
+}
+
 // What the document asks of interfaces that are not in it or not there.
 void RefuseUnknown(const NetDocument &wanted, const NetDocument &stored)
 {
@@ -95,21 +122,7 @@ void RefuseUnknown(const NetDocument &wanted, const NetDocument &stored)
         if (const auto card = stored.cards.find(name);
             card != stored.cards.end() && !card->second.contains("bond") && !card->second.contains("vlan"))
             refuse(name, "only a bond or a VLAN can be removed");
-    const std::string gateway = TextOf(wanted.net, "gateway");
-    const auto reaches = [&](const std::string &name, const NetFactsMap &facts) {
-        const auto own = wanted.cards.find(name);
-        const NetFactsMap &card = own != wanted.cards.end() && own->second.contains("mode") ? own->second : facts;
-        std::vector<std::string> all = TextsOf(card, "more_addresses");
-        all.push_back(TextOf(card, "address"));
-        return TextOf(card, "mode") == "dhcp" ||
-               std::any_of(all.begin(), all.end(), [&](const std::string &one) { return IsInNetwork(gateway, one); });
-    };
-    const auto any = [&](const std::map<std::string, NetFactsMap> &cards) {
-        return std::any_of(cards.begin(), cards.end(),
-                           [&](const auto &card) { return reaches(card.first, card.second); });
-    };
-    if (!gateway.empty() && !any(stored.cards) && !any(wanted.cards))
-        throw UsageFailure("take the document", "gateway: " + gateway + " is on the network of no card");
+    RefuseLostGateway(wanted, stored);
 }
 
 // What the start script says that it keeps over a restart of the system.
