@@ -22,6 +22,7 @@ using test::TavoctlAtTerminal;
 using test::Words;
 using test::WriteFile;
 using testing::AllOf;
+using testing::AnyOf;
 using testing::HasSubstr;
 using testing::Not;
 using testing::StartsWith;
@@ -309,8 +310,36 @@ TEST(TavoctlFrame, TablesShowTheChosenColumnsInTheWidthOfTheTerminal)
         for (const std::string &line : Lines(TavoctlAtTerminal(words).out))
             EXPECT_LE(line.size(), 81u) << line;  // with the carriage return
     }
-    // Colours are for terminals only.
-    EXPECT_THAT(Tavoctl({"error", "list"}).out, Not(HasSubstr("\x1b")));
+}
+
+TEST(TavoctlFrame, ColoursAndThePagerAreForTerminals)
+{
+    if (test::RootLacks("pts"))
+        GTEST_SKIP() << "needs a terminal";
+    const ScratchDir dir;
+    WriteFile(dir / "f", "a=degraded\nb=2\nc=3\n");
+    const Words list = {"conf", "list", "--file", dir / "f"};
+    const struct {
+        const char *variable, *value;
+        unsigned short rows;
+        bool coloured, paged;
+    } cases[] = {
+        {"TERM", "xterm", 0, true, false}, {"TERM", "xterm", 20, true, false},
+        {"TERM", "xterm", 3, true, true},  {"TERM", "dumb", 3, false, true},
+        {"NO_COLOR", "1", 3, false, true}, {"PAGER", "", 3, true, false},
+        {"PAGER", "cat", 3, true, false},  {"PAGER", "/no/such/program 2>/dev/null", 3, true, false},
+    };
+    for (const auto &[variable, value, rows, coloured, paged] : cases) {
+        ::unsetenv("NO_COLOR");
+        ::setenv("TERM", "xterm", 1);
+        ::setenv("PAGER", "sed 's/^/paged /'", 1);
+        ::setenv(variable, value, 1);
+        const std::string out = TavoctlAtTerminal(list, {}, rows).out;
+        EXPECT_THAT(out, AllOf(HasSubstr("degraded"), HasSubstr("3"))) << variable << value << rows;
+        EXPECT_EQ(out.find("\x1b[") != out.npos, coloured) << variable << value << rows << out;
+        EXPECT_EQ(out.starts_with("paged "), paged) << variable << value << rows << out;
+        EXPECT_THAT(Tavoctl(list).out, Not(AnyOf(HasSubstr("\x1b"), HasSubstr("paged"))));
+    }
 }
 
 TEST(TavoctlFrame, MistypedWordsAreSuggested)

@@ -14,6 +14,7 @@
 #include <vector>
 
 #include <fcntl.h>
+#include <sys/ioctl.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -64,8 +65,8 @@ struct Answer {
     std::string typed;   // the person types that
 };
 
-// At a terminal; everything shown comes back as it was sent.
-inline Ran TavoctlAtTerminal(const Words &words, const std::vector<Answer> &answers)
+// At a terminal of so many rows, 0 for unknown; everything shown comes back as it was sent.
+inline Ran TavoctlAtTerminal(const Words &words, const std::vector<Answer> &answers, unsigned short rows = 0)
 {
     const int master = ::posix_openpt(O_RDWR | O_NOCTTY | O_CLOEXEC);
     EXPECT_GE(master, 0);
@@ -74,6 +75,8 @@ inline Ran TavoctlAtTerminal(const Words &words, const std::vector<Answer> &answ
     const std::string name = ::ptsname(master);
     const int terminal = ::open(name.c_str(), O_RDWR | O_NOCTTY | O_CLOEXEC);
     EXPECT_GE(terminal, 0) << name;
+    const winsize size = {rows, 80, 0, 0};
+    EXPECT_TRUE(rows == 0 || ::ioctl(master, TIOCSWINSZ, &size) == 0);
     const pid_t pid = ::fork();
     if (pid == 0) {
         for (int fd = 0; fd < 3; ++fd)
