@@ -3,9 +3,9 @@
  *
  * A disk is "/dev/sd" and one letter (an internal bay or an external port) or two (the unit letter and the disk letter
  * of an expansion unit); a partition appends its decimal number. Functions that take a path accept exactly these names,
- * with "/dev/" or, where it says so, without; "a" is bay 1. A device number is major * 256 + minor.
+ * with "/dev/" or, where stated, without; "a" is bay 1. A device number is major * 256 + minor.
  *
- * Nothing is locked and nothing is cached. Power functions touch one disk after another: serialise them. Reading SMART
+ * Nothing is locked and nothing is cached. Power functions handle one disk after another: serialise them. Reading SMART
  * data (temperatures too) wakes a disk that sleeps.
  *
  * "Logged" failures leave a line in the system log; a code is recorded only where one is named.
@@ -32,10 +32,10 @@ enum {
     DISK_CONTAINER_ESATA = 8     /* the name that "esatadiskname" of /etc.defaults/tavoinfo.conf gives */
 };
 
-/* Which disks DiskInfoEnum looks for; 0 stands for all. */
+/* Which disks DiskInfoEnum looks for; 0 means all. */
 enum { DISK_ENUM_INTERNAL = 1, DISK_ENUM_UNITS = 2 };
 
-/* The code of TAVOIDiskRawOpen for a device that is no disk. It has no text. */
+/* The code of TAVOIDiskRawOpen for a device that is not a disk. It has no text. */
 enum { ERR_NOT_A_DISK = 22 };
 
 /* Commands of the two command interfaces. */
@@ -60,7 +60,7 @@ typedef struct DISKPATH {
     int32_t nPartition; /* the number after the letters; 0 without one */
 } DISKPATH;
 
-/* What there is to know about a disk. */
+/* The description of a disk. */
 typedef struct DISKINFO {
     int32_t iDisk;
     int32_t nNameKind;
@@ -90,9 +90,9 @@ typedef struct TAVODISKINFO {
 /* Values of TavoPartitionLayout.nKind and TavoPartitionEntry.nKind. */
 enum {
     DISK_LAYOUT_UNSET = 0,
-    DISK_LAYOUT_PLAIN = 1,  /* partitions of no layout of the system */
+    DISK_LAYOUT_PLAIN = 1,  /* partitions that match no layout of the system */
     DISK_LAYOUT_SYSTEM = 2, /* see tavo_partition.h */
-    DISK_LAYOUT_SPECIAL = 3 /* a device whose data lives in a fixed partition */
+    DISK_LAYOUT_SPECIAL = 3 /* a device whose data is in a fixed partition */
 };
 enum {
     DISK_ENTRY_UNUSED = 0,
@@ -126,115 +126,118 @@ typedef struct TavoPartitionLayout {
 
 /* --- which disks there are --- */
 
-/* Takes a path ("/dev/sda3" or "sda3", a newline may follow) apart. Returns 0, or -1, logged, with *pParsed untouched:
- * the path is none; with ERR_BAD_PARAMETERS an argument is NULL. What follows the first digit is not looked at. */
+/* Parses a path ("/dev/sda3" or "sda3"; a newline may follow). Returns 0; -1, logged, with *pParsed untouched, when the
+ * path does not name a disk; -1 with ERR_BAD_PARAMETERS when an argument is NULL. Text after the first digit is not
+ * checked. */
 TAVO_API int DiskPathParse(const char *szPath, DISKPATH *pParsed);
 
-/* Reads path, model, size and temperature of the disk that szPath, a disk or a partition of it, names. *ppInfo is a new
- * record for DiskInfoFree. The sources are the device, /sys/block/NAME/device/model and SMART attribute 194.
- * Returns 1; 0 when the bay is empty (opening the device gives ENXIO), silently; -1, logged, with
+/* Reads path, model, size and temperature of a disk; szPath names the disk or a partition of it. *ppInfo becomes a new
+ * record that the caller releases with DiskInfoFree. The sources are the device, /sys/block/NAME/device/model and SMART
+ * attribute 194.
+ * Returns 1; 0 when the bay is empty (opening the device fails with ENXIO), silently; -1, logged, with
  *   ERR_BAD_PARAMETERS   an argument is NULL
  *   ERR_OUT_OF_MEMORY
- * or without a code of its own: szPath is no disk, or the disk cannot be opened or asked for its size. *ppInfo is only
- * written with 1. A model that cannot be read is empty.
+ * or without a code of its own when szPath is not a disk, or the disk cannot be opened or its size read. *ppInfo is
+ * written only when 1 is returned. A model that cannot be read is empty.
  * Files: /sys/block */
 TAVO_API int DiskInfoGet(const char *szPath, DISKINFO **ppInfo);
 TAVO_API void DiskInfoFree(DISKINFO *pInfo);
 
 /* Reads the disks of all internal bays (TAVOMaxDiskGet; not the ports that lead to an expansion unit) and of all
- * expansion units that have power, in this order. pFilter points to DISK_ENUM_ flags; NULL or 0 for all. Empty bays and
- * disks that cannot be read are passed over, the latter logged.
- * Returns the number of disks and puts the list, NULL for none, into *ppList, for DiskInfoEnumFree. -1, with *ppList
- * NULL: ERR_BAD_PARAMETERS (ppList is NULL), ERR_OUT_OF_MEMORY, or the units cannot be enumerated.
+ * expansion units that have power, in this order. pFilter points to DISK_ENUM_ flags; NULL or 0 for all. Empty bays are
+ * skipped; disks that cannot be read are skipped and logged.
+ * Returns the number of disks and stores the list (NULL for none) in *ppList; the caller releases it with
+ * DiskInfoEnumFree. Returns -1 with *ppList NULL and ERR_BAD_PARAMETERS (ppList is NULL), ERR_OUT_OF_MEMORY, or a code
+ * of TAVOEBoxInfoEnum.
  * Files: /etc.defaults/tavoinfo.conf, /sys/block */
 TAVO_API int DiskInfoEnum(const int *pFilter, DISKLIST **ppList);
 TAVO_API void DiskInfoEnumFree(DISKLIST *pList);
 
 /* Appends a node with pInfo, which then belongs to the list. Returns 0, or -1 with ERR_BAD_PARAMETERS or
- * ERR_OUT_OF_MEMORY; pInfo is still the caller's then. */
+ * ERR_OUT_OF_MEMORY, and then the caller keeps pInfo. */
 TAVO_API int DiskListPush(DISKLIST **ppList, DISKINFO *pInfo);
 
-/* Gives the device numbers of all whole disks of /proc/partitions, IDE disks first, as a heap array for free.
- * nKind must be 1. Returns the count; 0 with *ppNumber NULL when there is none; -1 with
+/* Lists the device numbers of all whole disks of /proc/partitions, IDE disks first. *ppNumber becomes a heap array that
+ * the caller releases with free. nKind must be 1. Returns the count; 0 with *ppNumber NULL when there is none; -1 with
  *   ERR_BAD_PARAMETERS   nKind is not 1 or ppNumber is NULL
  *   ERR_OUT_OF_MEMORY
  *   ERR_OPEN_FAILED, ERR_READ_FAILED   /proc/partitions
  * Files: /proc/partitions */
 TAVO_API int TAVODiskEnum(int nKind, int32_t **ppNumber);
 
-/* Gives the summary of the disk with that device number as a heap block for free. nKind must be 1. Returns 0, or -1 with
+/* Reads the summary of the disk with that device number. *ppInfo becomes a heap block that the caller releases with
+ * free. nKind must be 1. Returns 0, or -1 with
  *   ERR_BAD_PARAMETERS      nKind is not 1 or ppInfo is NULL
  *   ERR_NO_DISK_ID          /proc/partitions has no whole disk of this number
- *   ERR_DISK_IO_FAILED      the disk cannot be opened or asked for its size
+ *   ERR_DISK_IO_FAILED      the disk cannot be opened or its size read
  *   ERR_NOT_ENOUGH_MEMORY   no memory for the record
  *   ERR_OUT_OF_MEMORY, ERR_OPEN_FAILED, ERR_READ_FAILED   /proc/partitions
  * Files: /proc/partitions */
 TAVO_API int TAVODiskGetInfo(int nKind, int nDevice, TAVODISKINFO **ppInfo);
 
-/* Tells where a disk sits: DISK_CONTAINER_ into *pKind. The path may lack its "/dev/". Returns 0, or -1, logged. Sets no
- * code. */
+/* Finds where a disk sits and stores the DISK_CONTAINER_ value in *pKind. The path may lack its "/dev/". Returns 0, or
+ * -1, logged. Sets no code. */
 TAVO_API int DiskContainerGet(const char *szPath, int *pKind);
 
 /* Returns 1 when the disk can be opened, 0 when not, -1 with ERR_BAD_PARAMETERS for NULL. */
 TAVO_API int DiskIsExist(const char *szPath);
 
-/* Gives the size in sectors of 512 bytes. Returns 1; 0 when the disk is absent (ENXIO), silently; -1, logged; with
- * ERR_BAD_PARAMETERS for a NULL argument. */
+/* Reads the size of a disk in sectors of 512 bytes. Returns 1; 0 when the disk is absent (ENXIO), silently; -1, logged,
+ * on failure; -1 with ERR_BAD_PARAMETERS for a NULL argument. */
 TAVO_API int DiskSizeGet(const char *szPath, uint64_t *pcSector);
 
-/* Gives the size in MiB of the device with the kernel name szName ("sdq1"). Returns 0, or -1 with
+/* Reads the size in MiB of the device with the kernel name szName ("sdq1"). Returns 0, or -1 with
  *   ERR_BAD_PARAMETERS   an argument is NULL, or szName is empty, begins with a dot or holds a "/"
- *   ERR_DISK_IO_FAILED   the device cannot be opened or asked for its size */
+ *   ERR_DISK_IO_FAILED   the device cannot be opened or its size read */
 TAVO_API int TAVODiskUSBGetInfo(const char *szName, uint64_t *pcMib);
 
 /* Splits a name at its trailing number: "sda3" into "sda" and 3. The number begins at a digit from 1 to 9, so "sda10"
- * gives 10 and "sda03" the name "sda0" and 3. The name needs cbBase - 1 characters or
- * fewer.
- * Returns the number; 0 without one, when the name is the whole path; -1, with szBase as it was, when the path begins with
- * a digit from 1 to 9, is empty, or its name or number is too long; -1 with ERR_BAD_PARAMETERS when an argument is NULL or
- * cbBase is below 2. */
+ * becomes "sda" and 10, and "sda03" becomes "sda0" and 3. The name must fit in cbBase bytes with its NUL.
+ * Returns the number; 0 without one, when the name is the whole path; -1, with szBase unchanged, when the path begins
+ * with a digit from 1 to 9, is empty, or its name or number is too long; -1 with ERR_BAD_PARAMETERS when an argument is
+ * NULL or cbBase is below 2. */
 TAVO_API int TAVODiskPartitionNumGet(const char *szPath, char *szBase, int cbBase);
 
-/* Gives the path of the disk or partition that an open descriptor belongs to, as a heap text for free. The source is
- * /sys/dev/block. NULL with
- *   ERR_STAT_FAILED     fd is no open descriptor
- *   ERR_NOT_A_DISK      it is no block device
+/* Returns the path of the disk or partition that an open descriptor belongs to, as a heap string that the caller
+ * releases with free. The source is /sys/dev/block. NULL with
+ *   ERR_STAT_FAILED     fd is not an open descriptor
+ *   ERR_NOT_A_DISK      it is not a block device
  *   ERR_NO_DISK_ID      the kernel has no such device (any more)
  *   ERR_OUT_OF_MEMORY
  * Files: /sys/dev/block */
 TAVO_API char *TAVODiskGetDevnameFromFd(int fd);
 
-/* Gives the drive model of the whole disk szPath, as it stands in /sys/block/NAME/device/model; a longer text is cut.
- * Returns 0, or -1, logged: the disk cannot be opened, there is no model; with ERR_BAD_PARAMETERS for a NULL argument, a
- * size below 1 or a path that is not "/dev/" and a plain name.
+/* Copies the drive model of the whole disk szPath from /sys/block/NAME/device/model; text that does not fit is cut.
+ * Returns 0; -1, logged, when the disk cannot be opened or has no model; -1 with ERR_BAD_PARAMETERS for a NULL
+ * argument, a size below 1 or a path that is not "/dev/" and a plain name.
  * Files: /sys/block */
 TAVO_API int TAVOLnxDiskGetModel(const char *szPath, char *szModel, int cbModel);
 
-/* Tells whether the disk hangs on a controller that takes raw commands through marvell_command_interface: 1 or 0; -1,
- * logged, when its link in /sys/block or the controller's id cannot be read.
+/* Returns 1 when the disk's controller takes raw commands through marvell_command_interface, else 0; -1, logged, when
+ * the disk's link in /sys/block or the controller's id cannot be read.
  * Files: /sys/block */
 TAVO_API int TAVODiskIsMvSocDriver(const char *szPath);
 
-/* Tells from the identification of the drive whether it has no rotating medium: 1 or 0; -1, logged, when it cannot be
- * read. An old drive without SMART counts as such a drive. */
+/* Returns 1 when the drive's identification says that it has no rotating medium, else 0; -1, logged, when the
+ * identification cannot be read. An old drive without SMART counts as one without a rotating medium. */
 TAVO_API int TAVODiskIsSSD(const char *szPath);
 
-/* Tells whether a stick carries a FAT or NTFS file system without a partition table: 1 or 0; 0 also when its first
+/* Returns 1 when a USB disk carries a FAT or NTFS file system without a partition table, else 0; 0 also when its first
  * sector cannot be read. Sets no code. */
 TAVO_API int TAVOIsUSBDiskFATNoPartition(const char *szPath);
 
-/* Reads how far the wiping job of a disk has come, in MiB, from /tmp/tavodd.NAME, which the job writes. Returns 0 when
- * both numbers were read, and also 0, with both outputs untouched, when there is no such file: no job. -1 when the line
- * is malformed, an argument is NULL, or the path does not end in a plain name.
+/* Reads the progress of a disk's wiping job, in MiB, from /tmp/tavodd.NAME, which the job writes. Returns 0 when both
+ * numbers were read; 0 with both outputs untouched when there is no such file and so no job; -1 when the line is
+ * malformed, an argument is NULL, or the path does not end in a plain name.
  * Files: /tmp/tavodd.* */
 TAVO_API int DiskDDStatusGet(const char *szPath, uint64_t *pcMibDone, uint64_t *pcMibTotal);
 
 /* Clears a layout and numbers the entries 0 to 511. NULL is ignored. */
 TAVO_API void DiskPartitionsLayoutInit(TavoPartitionLayout *pLayout);
 
-/* Fills the caller's block with the partitions of the disk of kernel name szName ("sda") from /proc/partitions, and tells
- * what kind of layout they make. Returns 0, also when there is no such disk (nEntry is 0 then); -1, logged: the file
- * cannot be read, or with ERR_BAD_PARAMETERS an argument is NULL or the name shorter than 2 characters.
+/* Fills the caller's block with the partitions of the disk of kernel name szName ("sda") from /proc/partitions, and
+ * sets the kind of their layout. Returns 0, also when there is no such disk (nEntry is then 0); -1, logged, when the
+ * file cannot be read; -1 with ERR_BAD_PARAMETERS when an argument is NULL or the name shorter than 2 characters.
  * Files: /proc/partitions */
 TAVO_API int DiskPartitionsLayoutGet(const char *szName, TavoPartitionLayout *pLayout);
 
@@ -245,32 +248,34 @@ TAVO_API int DiskPartitionsLayoutGet(const char *szName, TavoPartitionLayout *pL
  *   ERR_BAD_PARAMETERS    szPath is NULL
  *   ERR_OPEN_RAWDEVICE    it cannot be opened
  *   ERR_STAT_FAILED       its state cannot be read
- *   ERR_NOT_A_DISK        it is no block device of a disk major */
+ *   ERR_NOT_A_DISK        it is not a block device with the major number of a disk */
 TAVO_API int TAVOIDiskRawOpen(const char *szPath);
 
-/* Sends one DISK_COMMAND_ on an open disk. pData is what the command returns (or takes); it may be NULL for a command
- * without data. Returns 0, or -1, logged. Sets no code. The first goes through the HDIO_DRIVE_CMD request; the second,
- * for controllers without it, through SCSI pass-through (SG_IO). */
+/* Sends one DISK_COMMAND_ to an open disk. pData receives (or holds) the command's data; it may be NULL for a command
+ * without data. Returns 0, or -1, logged. Sets no code. ata_command_interface uses the HDIO_DRIVE_CMD request,
+ * marvell_command_interface SCSI pass-through (SG_IO), for controllers without that request. */
 TAVO_API int ata_command_interface(int fd, int nCommand, unsigned char *pData);
 TAVO_API int marvell_command_interface(int fd, int nCommand, unsigned char *pData);
 
-/* Reads the 512 bytes of SMART data into pBuffer, enabling SMART first when it is off. With fCheck the thresholds must be
- * readable too, and the sum of the data page 0 modulo 256. Returns 0, or -1 (a wrong sum is logged). */
+/* Reads the 512 bytes of SMART data into pBuffer, enabling SMART first when it is off. With fCheck the thresholds must
+ * also be readable, and the bytes of the data page must sum to 0 modulo 256. Returns 0, or -1 (a wrong sum is logged).
+ * */
 TAVO_API int SmartDataRead(const char *szPath, unsigned char *pBuffer, int fCheck);
 
-/* SMART attribute 194 in degrees Celsius; -1 when the disk has none or cannot be read, the latter logged. */
+/* Returns SMART attribute 194 in degrees Celsius; -1 when the disk has no such attribute, or, logged, cannot be read.
+ * */
 TAVO_API int TAVODiskTemperatureGet(const char *szPath);
 TAVO_API int TAVODiskTemperatureC(const char *szPath);
 
 /* --- power and cache. All return -1 when the disk cannot be opened (the codes of TAVOIDiskRawOpen) or refuses --- */
 
-/* Gives the power state into *pState: 0 is standby, other values mean spinning. Returns 0 or -1. */
+/* Reads the power state into *pState: 0 is standby, other values mean spinning. Returns 0 or -1. */
 TAVO_API int TAVOIDiskCheckPower(const char *szPath, unsigned char *pState);
 
 /* Spins a disk down, unless it is in standby already. Returns 0 or -1. A NULL path is logged. */
 TAVO_API int TAVOIDiskSetDiskStandby(const char *szPath);
 
-/* Writes everything that the kernel holds for the disk, and has the drive empty its cache. Returns 0 or -1. */
+/* Writes the kernel's buffers to the disk and flushes the drive's cache. Returns 0 or -1. */
 TAVO_API int TAVOIDiskFlushBuffer(const char *szPath);
 
 /* Puts the drive to sleep; only a reset wakes it. Returns 0 or -1. */
@@ -283,28 +288,29 @@ TAVO_API int TAVOIDiskReset(const char *szPath);
  * for another value or a NULL path. */
 TAVO_API int TAVOIDiskSetDiskStandbyTimer(const char *szPath, int nValue);
 
-/* Flushes /dev/sda to /dev/sdj, waits 10 seconds and spins each down. Returns 0 when every disk that is there did. */
+/* Flushes /dev/sda to /dev/sdj, waits 10 seconds and spins each down. Returns 0 when every present disk did. */
 TAVO_API int TAVODiskSetStandby(void);
 
 /* Sets the spin-down timer of /dev/sda to /dev/sdj. nMinute is 0 (never), 1 to 21, a multiple of 30 up to 330, or 480.
  * Every choice but 0 programs the same fixed value, 0xFB: the drives' own timer only backs up the system's. The minutes
- * are saved when all drives took it. Returns 0, or -1 and nothing saved: ERR_BAD_PARAMETERS for other minutes, else a
- * drive refused or saving failed. */
+ * are saved when all drives accepted it. Returns 0, or -1 with nothing saved: ERR_BAD_PARAMETERS for other minutes,
+ * otherwise when a drive refused or saving failed. */
 TAVO_API int TAVODiskSetStandbyTimer(int nMinute);
 
-/* The same by seconds, in steps of 5 rounded up, 1 to 1200; nothing is saved. -1 with ERR_BAD_PARAMETERS outside. */
+/* As TAVODiskSetStandbyTimer with 1 to 1200 seconds, rounded up to a multiple of 5; nothing is saved. Returns -1 with
+ * ERR_BAD_PARAMETERS for other values. */
 TAVO_API int TAVODiskSetStandbySeconds(int nSecond);
 
-/* Gives the saved minutes. Returns 0; -1 with ERR_BAD_PARAMETERS for NULL, or when nothing is saved. */
+/* Reads the saved minutes. Returns 0; -1 with ERR_BAD_PARAMETERS for NULL, or when nothing is saved. */
 TAVO_API int TAVODiskGetStandbyTimer(int *pnMinute);
 
-/* The saved minutes themselves, the key "standbytimer" of /etc/tavoinfo.conf. Get returns -1 when there is no number.
- * Set returns 0, or -1 with the code of TAVOINFOSetKeyValue; it takes the settings file's lock.
+/* The saved minutes, the key "standbytimer" of /etc/tavoinfo.conf. Get returns them, or -1 when the key is not a
+ * number. Set returns 0, or -1 with the code of TAVOINFOSetKeyValue; it takes the lock of the settings file.
  * Files: /etc/tavoinfo.conf */
 TAVO_API int TAVODiskGetFileSBTimerSetting(void);
 TAVO_API int TAVODiskSetFileSBTimerSetting(int nMinute);
 
-/* The drive's write cache. Get returns 1 enabled, 0 disabled or not known. Set returns 0 or -1. */
+/* The drive's write cache. Get returns 1 when it is enabled, 0 when it is disabled or unknown. Set returns 0 or -1. */
 TAVO_API int TAVODiskWriteCacheGet(const char *szPath);
 TAVO_API int TAVODiskWriteCacheSet(const char *szPath, int fEnable);
 

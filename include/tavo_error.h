@@ -1,10 +1,10 @@
 /*
  * Error state and error codes.
  *
- * Every function of the library reports failure the same way: it returns its failure value (-1, NULL or 0), after it
- * has recorded a code together with the source module and the line that found the failure. The record is one for the
- * whole process, not one for each thread: serialise calls into the library, or accept that another thread's failure
- * overwrites the code before you read it. Success never clears it, so look at it only after a failure value.
+ * Every function of the library reports failure the same way: it records a code together with the source module and
+ * line that found the failure, and returns its failure value (-1, NULL or 0). The whole process shares one record:
+ * serialise calls into the library, or accept that another thread's failure overwrites the code before you read it.
+ * Success never clears it, so read it only after a failure value.
  */
 #ifndef TAVO_ERROR_H
 #define TAVO_ERROR_H
@@ -114,7 +114,7 @@ enum {
     ERR_VOLUME_SIZE_TOO_LARGE   = 0x8200,
     ERR_YP_BIND                 = 0x9000,
 
-    /* The codes that have no text in rgszErrMsg: their slot holds "", or lies past the end of the table. */
+    /* The codes that have no text in rgszErrMsg: their slot holds "", or is past the end of the table. */
     ERR_REMOVE_FAILED           = 0x3900, /* removing files or directories failed */
     ERR_MOVE_FAILED             = 0x3A00, /* moving a directory tree failed */
     ERR_COPY_FAILED             = 0x3B00, /* copying files failed */
@@ -139,7 +139,7 @@ enum {
     ERR_MAKE_PATH               = 0xA100, /* making a directory with its parents failed, or a share folder is not empty */
     ERR_DB_INTERRUPTED          = 0xA700, /* a store operation was interrupted */
     ERR_RESERVED_A9             = 0xA900, /* reserved */
-    ERR_DB_OPEN                 = 0xB100, /* a file is no account store */
+    ERR_DB_OPEN                 = 0xB100, /* a file is not an account store */
     ERR_DB_CURSOR               = 0xB200, /* reading or walking an account store failed */
     ERR_DB_STORE                = 0xB300, /* storing into an account store failed */
     ERR_DB_DELETE               = 0xB400, /* deleting from an account store failed */
@@ -172,13 +172,13 @@ extern TAVO_API const int32_t errNum;
 /* Always 96; nothing in the library reads it. */
 extern TAVO_API const int32_t codeNum;
 
-/* A second error cell, the volume module's alone; independent of tavoerrno. */
+/* A second error code, for the volume module only; independent of tavoerrno. */
 extern TAVO_API int32_t volerr;
 
 /* Returns tavoerrno. */
 TAVO_API int TLIBErrGet(void);
 
-/* Sets tavoerrno to code and forgets the source: the module becomes NULL and the line 0. For programs; the library
+/* Sets tavoerrno to code and clears the source: the module becomes NULL and the line 0. Meant for programs; the library
  * itself always records a source. */
 TAVO_API void TLIBErrSet(int code);
 
@@ -192,25 +192,25 @@ TAVO_API const char *TAVOErrorGetFile(void);
 /* The line recorded by the last TLIBErrSetEx; 0 before the first one and after TLIBErrSet. */
 TAVO_API int TAVOErrorGetLine(void);
 
-/* Prints the name that belongs to the calling thread's errno, taken as one of the codes above, and a newline to
- * standard output. An unnamed slot prints an empty line; a value that is no code (low byte not 0, or outside the
- * table) prints nothing. It looks at errno, not at tavoerrno. */
+/* Prints the name of the code in the calling thread's errno (not tavoerrno), and a newline, to standard output. A code
+ * without a name prints an empty line; a value that is not a code (low byte not 0, or outside the table) prints
+ * nothing. */
 TAVO_API void TLIBErrPrint(void);
 
 /* Empties the log file szPath, creating it (mode 0644) when it is missing, and syncs it to disk. A NULL path, or a file
- * that cannot be opened, is silently left alone. In a directory that everybody may write to, so is everything but a
- * regular file that belongs to root or to the caller and has no second name. Sets no code. */
+ * that cannot be opened, is silently left alone. In a directory that everybody may write to, only a regular file that
+ * belongs to root or to the caller and has no second name is emptied. Sets no code. */
 TAVO_API void TLIBErrLogInitial(const char *szPath);
 
 /* Appends szMessage and a newline to the log file szPath (created with mode 0644 when missing) and syncs it to disk.
- * "%%" in the message is written as one "%"; every other "%" stands for itself.
+ * "%%" in the message is written as one "%"; every other "%" is written as it is.
  * Returns 0, or -1 with
  *   ERR_BAD_PARAMETERS  szPath or szMessage is NULL
  *   ERR_OPEN_FAILED     the file cannot be opened, or TLIBErrLogInitial would leave it alone
- *   ERR_WRITE_FAILED    the text could not be written and synced; a part of it may stand in the file */
+ *   ERR_WRITE_FAILED    the text could not be written and synced; the file may hold a part of it */
 TAVO_API int TLIBErrLogSet(const char *szPath, const char *szMessage);
 
-/* Reserved entry points: they return at once. */
+/* Reserved entry points; they do nothing. */
 TAVO_API void TAVOErrorBackTracePrint(void);
 TAVO_API void TAVOErrorBackTraceLog(void);
 TAVO_API void TAVOErrorBackTracePanic(void);

@@ -1,30 +1,30 @@
 /*
  * Settings files: lines of key and value.
  *
- * One setting a line. A line that begins with "#" or ";" is a comment; a blank line or one without "=" sets nothing.
- * The key is the text before the first "=" (leading "=" signs are passed over: "=x" has the key x and no value), the
- * value is the rest of the line. White space (tab, line feed, carriage return, space) is taken off both ends of each,
- * and then one pair of double quotes that encloses what is left; so the line "k"=v sets the key k too. Keys match byte
+ * One setting per line. A line that begins with "#" or ";" is a comment; a blank line or one without "=" sets nothing.
+ * The key is the text before the first "=" (leading "=" signs are skipped: "=x" has the key x and no value), the
+ * value is the rest of the line. White space (tab, line feed, carriage return, space) is removed from both ends of
+ * each, and then one pair of enclosing double quotes; so the line "k"=v sets the key k too. Keys match byte
  * for byte. A line may have any length; a NUL byte ends a value, and lines that are only copied keep it.
  *
- * Writers refuse with ERR_BAD_PARAMETERS what could not be read back: a line feed or carriage return in a key or a
+ * Writers refuse text that could not be read back with ERR_BAD_PARAMETERS: a line feed or carriage return in a key or a
  * value, and a key that is empty, holds "=", begins with "#", ";" or "[", or has white space or a pair of double quotes
  * around it. A caller's own line format (NULL: "%s=%s\n") takes the key and then the value: exactly two "%s", and "%%"
  * for a percent sign; any other "%" is refused with ERR_BAD_PARAMETERS. A format should end with a newline.
  *
  * Rewriting is safe: the new text goes to a temporary file beside the target (its name and six random characters
  * after a dot), is synced to disk, gets the owner, group, permission bits and extended attributes of the old file, and
- * is renamed over it. A crash leaves the old file or the new one. A symbolic link is followed and stays a link, except in
- * a directory that everybody may write to (/tmp), where writers refuse it with ERR_OPEN_FAILED; a hard link is cut. After
- * a failure the old file is as it was and the temporary file is gone. A new file has mode 0644, whatever the umask. The
- * codes of a rewrite are
+ * is renamed over it. A crash leaves the old file or the new one. A symbolic link is followed and stays a link, except
+ * in a directory that everybody may write to (/tmp), where writers refuse it with ERR_OPEN_FAILED; a hard link is cut.
+ * After a failure the old file is as it was and the temporary file is gone. A new file has mode 0644, whatever the
+ * umask. The codes of a rewrite are
  *   ERR_OPEN_FAILED     the file cannot be opened or is not a regular file, or the temporary file cannot be created
  *   ERR_STAT_FAILED     the state of the open file cannot be read
  *   ERR_WRITE_FAILED    reading the old text or writing the new one failed (a full disk)
  *   ERR_RENAME_FAILED   the new file could not take the old one's place
  *   ERR_OUT_OF_MEMORY   no memory
  *
- * Nothing is locked and nothing is cached: of two rewrites at the same time one is lost, unless the callers hold the
+ * Nothing is locked and nothing is cached: of two simultaneous rewrites one is lost, unless the callers hold the
  * file's lock (tavo_lock.h). Paths are NUL-terminated; FIFOs, devices and directories are refused without waiting.
  */
 #ifndef TAVO_FILE_H
@@ -61,7 +61,7 @@ TAVO_API int TLIBFileSetKeyValue(const char *szPath, const char *szKey, const ch
  * or -1 with the old text in place and
  *   ERR_BAD_PARAMETERS  a NULL argument other than szFormat, a directory, or see above
  *   ERR_OPEN_FAILED     the file cannot be opened for writing, or created; or it is, in a directory that everybody may
- *                       write to, a link, a file of somebody else's, or one with a second name
+ *                       write to, a link, another user's file, or one with a second name
  *   ERR_WRITE_FAILED    the line could not be written and synced
  *   ERR_READ_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileAppendKey(const char *szPath, const char *szKey, const char *szValue, const char *szFormat);
@@ -130,15 +130,15 @@ TAVO_API int TLIBFileMatchLineNo(const char *szPath, const char *szKey);
  * ERR_OUT_OF_MEMORY. */
 TAVO_API int TLIBFileReadLines(const char *szPath, TLIBSZLIST **ppslLines);
 
-/* Puts ";" in front of every line that sets szKey. The new text is made in /etc/skel/tempErrTLIBFileComment when that
- * lies on the same file system and nothing else stands there, else as any other rewrite.
+/* Puts ";" in front of every line that sets szKey. The new text is written to /etc/skel/tempErrTLIBFileComment when
+ * that is on the same file system and nothing else is there, otherwise to a temporary file like any other rewrite.
  * Returns 1, 0 with ERR_KEY_NOT_FOUND and the file untouched, or -1 with ERR_BAD_PARAMETERS (a NULL argument) or a code
  * of a rewrite.
  * Files: /etc/skel/tempErrTLIBFileComment (created and renamed)
  * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
 TAVO_API int TLIBFileComment(const char *szPath, const char *szKey);
 
-/* Replaces szOld by szNew wherever it stands in a line, from left to right, by a safe rewrite.
+/* Replaces every occurrence of szOld within a line by szNew, from left to right, by a safe rewrite.
  * Returns the number of replacements (0: the file is untouched), or -1 with ERR_BAD_PARAMETERS (a NULL argument, an
  * empty szOld, a newline in either text) or a code of a rewrite.
  * Errors: ERR_OPEN_FAILED, ERR_STAT_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED, ERR_OUT_OF_MEMORY */
@@ -151,15 +151,15 @@ TAVO_API int TLIBFileReplaceSubStr(const char *szPath, const char *szOld, const 
  *   ERR_OPEN_FAILED     the file or the stream cannot be created; no file is left */
 TAVO_API FILE *TLIBFileTempFileOpen(char *szTemplate);
 
-/* Writes szPrefix and "PID-COUNT" to szBuf of cbBuf bytes; COUNT begins at 0 in a process and rises by one a call. It
- * is a name only: nothing is created, and others can guess it, so create it with O_EXCL. Returns 0, or -1 with szBuf
- * untouched and ERR_BAD_PARAMETERS (a NULL argument, a negative size, a name that does not fit). */
+/* Writes szPrefix and "PID-COUNT" to szBuf of cbBuf bytes; COUNT begins at 0 in a process and rises by one
+ * per call. Nothing is created, and others can guess the name, so create the file with O_EXCL. Returns 0, or -1 with
+ * szBuf untouched and ERR_BAD_PARAMETERS (a NULL argument, a negative size, a name that does not fit). */
 TAVO_API int TLIBFileITmpName(const char *szPrefix, char *szBuf, int cbBuf);
 
 /* Creates an empty file (mode 0644, whatever the umask) unless the file exists; an existing file is left alone, its
  * times too.
- * Returns 0, or -1 with ERR_BAD_PARAMETERS (NULL) or ERR_OPEN_FAILED (cannot be created, is not a regular file, or is one
- * that TLIBFileAppendKey refuses). */
+ * Returns 0, or -1 with ERR_BAD_PARAMETERS (NULL) or ERR_OPEN_FAILED (cannot be created, is not a regular file, or is
+ * one that TLIBFileAppendKey refuses). */
 TAVO_API int TLIBFileTouch(const char *szPath);
 
 /* Removes a leading UTF-8 byte-order mark by a safe rewrite.
@@ -177,7 +177,7 @@ TAVO_API int BlTAVOFileCheckKeyValue(const char *szPath, const char *szKey, cons
 TAVO_API int TLIBILineKeyMatch(const char *szLine, const char *szKey);
 
 /* Sets a key of /etc/tavoinfo.conf, the system settings file, as TLIBFileSetKeyValue does with the default format,
- * while it holds that file's lock (0x800, exclusive; waits at most 5 seconds for it). Returns 1, or -1 with
+ * while it holds the lock of that file. Returns 1, or -1 with
  * ERR_LOCK_FAILED or a code of TLIBFileSetKeyValue.
  * Files: /etc/tavoinfo.conf (rewritten)
  * Locks: TAVO_LOCK_TAVOINFO (exclusive, at most 5 s)

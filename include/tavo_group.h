@@ -1,20 +1,21 @@
 /*
  * Local groups.
  *
- * The groups live in the account cache database (tavo_bdb.h). After every change the two files that the rest of the
- * system reads are written anew from it, each by a temporary file and a rename:
+ * The groups live in the account cache database (tavo_bdb.h). After every change the library rewrites the two files
+ * that the rest of the system reads, each by a temporary file and a rename:
  *   /etc/group, /etc/group_desc
- * When one of them has been edited by somebody else, or the database is missing or damaged, the next call builds the
- * database from the files first. docs/accounts.md tells what happens in which order.
+ * When another program has edited one of them, or the database is missing or damaged, the next call first rebuilds the
+ * database from the files. docs/accounts.md describes the order of the steps.
  *
  * Group names are compared without regard to case; the case that was typed is kept. A name that holds a backslash
  * ("DOMAIN\group") is a domain group: it shares the record but is never written to the local files, and on an appliance
  * without a domain none is ever found. Everybody is a member of "users", so its members are never stored.
  *
- * Changing needs root. TAVOGroupSet holds the password, group and Samba locks exclusively (tavo_lock.h), TAVOGroupDelete
- * the group and Samba locks, TAVOGroupDescSet and TAVOUserModifyGroup the group lock, each also the system's own lock on
- * the account files (lckpwdf); reading holds the group lock shared. Each waits at most 5 seconds. Who takes locks of
- * its own takes the password lock before the group lock and that before the Samba lock.
+ * Changing needs root. TAVOGroupSet holds the password, group and Samba locks exclusively (tavo_lock.h),
+ * TAVOGroupDelete the group and Samba locks, TAVOGroupDescSet and TAVOUserModifyGroup the group lock, each also the
+ * system's own lock on the account files (lckpwdf); reading holds the group lock shared. Each waits at most 5 seconds.
+ * A program that takes these locks itself takes the password lock before the group lock, and the group lock before the
+ * Samba lock.
  *
  * Unless said otherwise a function returns 0 or a count, or -1 with the code set. Any of them may fail with
  *   ERR_OUT_OF_MEMORY  no memory
@@ -51,8 +52,8 @@ enum { TAVO_GROUP_GID_MIN = 65536, TAVO_GROUP_GID_MAX = 95536 };
 /* One group. A single block: release it with TAVOGroupFree only. */
 typedef struct TAVOGROUP {
     char *szName;      /* as it was typed */
-    int32_t nGid;      /* -1 when handed in: choose one (add), keep it (change) */
-    char **rgszMember; /* names of users, NULL at the end; when handed in NULL means none */
+    int32_t nGid;      /* -1 when passed in: choose one (add), keep it (change) */
+    char **rgszMember; /* names of users, NULL at the end; when passed in NULL means none */
     int32_t nKind;     /* one of TAVO_GROUP_KIND_ */
     int32_t cbBlock;   /* bytes of the whole block */
 } TAVOGROUP;
@@ -73,7 +74,7 @@ typedef struct TAVOGROUPDB {
  * which may move. Release the record with TAVOGroupFree.
  * Fails, the record untouched, with
  *   ERR_BAD_PARAMETERS     an argument is NULL
- *   ERR_FORMAT_ERROR       the line has not four fields, or the third is no number
+ *   ERR_FORMAT_ERROR       the line does not have four fields, or the third is not a number
  *   ERR_INVALID_GROUPNAME  the name is empty */
 TAVO_API int TAVOGroupAlloc(TAVOGROUP **ppGroup, const char *szLine);
 
@@ -89,8 +90,8 @@ TAVO_API void TAVOGroupFree(TAVOGROUP *pGroup);
  * Reading.
  */
 
-/* 1 when a new group may have this name, else 0: 1 to 15 characters, ASCII letters, digits, ".", "-", "_", blanks and
- * everything beyond ASCII; neither "-" nor a blank at the beginning, no blank at the end. */
+/* Returns 1 when a new group may have this name, else 0: 1 to 15 characters, ASCII letters, digits, ".", "-", "_",
+ * blanks and everything beyond ASCII; neither "-" nor a blank at the beginning, no blank at the end. */
 TAVO_API int BlTLIBIsGroupName(const char *szName);
 
 /* Reads one group by name (any case) or by group id into *ppGroup: NULL, or a record to be refilled. The caller
@@ -105,9 +106,9 @@ TAVO_API int BlTLIBIsGroupName(const char *szName);
 TAVO_API int TAVOGroupGet(const char *szName, TAVOGROUP **ppGroup);
 TAVO_API int TAVOGroupGetByGID(int gid, TAVOGROUP **ppGroup);
 
-/* Appends the names of the groups that `flags` (TAVO_GROUP_) select, in the order of their upper-case names, and returns
- * how many. Local groups with ids below 65536 belong to the system and are not listed, except "users". The list may
- * move: *ppList is updated, also when the call fails half-way.
+/* Appends the names of the groups that `flags` (TAVO_GROUP_) select, in the order of their upper-case names, and
+ * returns their number. Local groups with ids below 65536 belong to the system and are not listed, except "users". The
+ * list may move: *ppList is updated, also when the call fails half-way.
  * ByPrefix and BySubstr list only names that begin with, or hold, szText, without regard to case; "" selects all.
  * Fails with
  *   ERR_BAD_PARAMETERS  ppList, *ppList or szText is NULL, or no flag is set
@@ -123,14 +124,14 @@ TAVO_API int TAVOGroupEnumBySubstr(TLIBSZLIST **ppList, int flags, const char *s
  * Locks: TAVO_LOCK_GROUP (shared, at most 5 s) */
 TAVO_API int TAVOGroupTotalNum(int flags);
 
-/* Appends the members of a group that are existing users, in their stored order, and returns how many; for "users" (any
- * case) every local user that TAVOUserEnum lists. Fails as TAVOGroupGet and TAVOUserEnum. */
+/* Appends the members of a group that are existing users, in their stored order, and returns their number; for "users"
+ * (any case) every local user that TAVOUserEnum lists. Fails as TAVOGroupGet and TAVOUserEnum. */
 TAVO_API int TAVOGroupListMember(const char *szName, TLIBSZLIST **ppList);
 
 /* Copies the description of a group into szBuf of cbBuf bytes: "" when it has none. Returns its length with the NUL;
  * szBuf NULL with cbBuf 0 asks for that.
  * Fails with
- *   ERR_BAD_PARAMETERS     the name is NULL or empty, or the buffer none
+ *   ERR_BAD_PARAMETERS     the name is NULL or empty, or szBuf is NULL and cbBuf is not 0
  *   ERR_NO_SUCH_GROUP      there is no such group
  *   ERR_INVALID_GROUPNAME  the name cannot be converted
  *   ERR_NOT_ENOUGH_MEMORY  the buffer is too small
@@ -142,13 +143,13 @@ TAVO_API int TAVOGroupDescGet(const char *szName, char *szBuf, int cbBuf);
  * Changing.
  *
  * When the files cannot be written these functions fail with ERR_OPEN_FAILED, ERR_WRITE_FAILED, ERR_NOT_ENOUGH_SPACE
- * or ERR_RENAME_FAILED; the files are the old ones, and the next call goes back to them. ERR_UNLOCK_FAILED means that
- * all was done but the locks could not be given back.
+ * or ERR_RENAME_FAILED; the old files stay in place, and the next call returns to them. ERR_UNLOCK_FAILED means that
+ * the change was made but the locks could not be released.
  */
 
-/* Adds a group (szOldName NULL) or changes the one called szOldName, also its name. The description of a renamed group
- * goes with it, and so do its places in the privilege lists of the shared folders and in Samba's settings; a failure
- * there is logged only.
+/* Adds a group (szOldName NULL) or changes the one called szOldName, also its name. A renamed group
+ * keeps its description and its entries in the privilege lists of the shared folders and in Samba's settings; a failure
+ * there is only logged.
  * Fails, nothing changed, in this order with
  *   ERR_BAD_PARAMETERS     pGroup or its name is NULL
  *   ERR_TOO_MANY_GROUPS    no group id is free (add, id -1)
@@ -162,9 +163,10 @@ TAVO_API int TAVOGroupDescGet(const char *szName, char *szBuf, int cbBuf);
  * Locks: TAVO_LOCK_USER (exclusive, at most 5 s), TAVO_LOCK_GROUP (exclusive), TAVO_LOCK_SMB (exclusive) */
 TAVO_API int TAVOGroupSet(const char *szOldName, const TAVOGROUP *pGroup);
 
-/* Deletes groups, "system" ones too: there is no protected name. Domain groups are skipped; a group that does not exist
- * or cannot be deleted is logged, its code stays in the error state, and the others are deleted all the same. The
- * groups also leave the privilege lists of the shared folders and Samba's settings; a failure there is logged only.
+/* Deletes groups, including those of the system: no name is protected. Domain groups are skipped. A group that does not
+ * exist or cannot be deleted is logged and its code stays in the error state; the others are still deleted. The groups
+ * are also removed from the privilege lists of the shared folders and from Samba's settings; a failure there is only
+ * logged.
  * Returns 0 also when none was deleted. Fails with ERR_BAD_PARAMETERS (rgszName NULL with nGroup not 0, or nGroup
  * negative).
  * Files: /etc/group, /etc/group_desc, /tmp/.db.group.*, /usr/tavo/etc/smb.conf, /usr/tavo/etc/share.conf
@@ -192,15 +194,16 @@ TAVO_API int TAVOUserModifyGroup(const TLIBSZHASH *pshNames);
  * The open database, for programs that hold the group lock exclusively.
  */
 
-/* The next free group id, from 65536 to 95536 and round again, behind the one that was handed out last.
+/* Returns the next free group id after the one assigned last, from 65536 to 95536 and then from the beginning.
  * Fails with
  *   ERR_BAD_PARAMETERS   pDb or its store pGid is NULL
  *   ERR_TOO_MANY_GROUPS  all are taken
  *   ERR_DB_CURSOR        the store cannot be read */
 TAVO_API int TAVOGroupDBGetFreeGid(TAVOGROUPDB *pDb);
 
-/* Stores one group; szOldName as in TAVOGroupSet. Neither the files nor the id handed out last are touched. Fails as
- * TAVOGroupSet does, with the codes of TAVOBDbSet, and with ERR_GROUP_DB_DELETE when the old entries cannot be deleted.
+/* Stores one group; szOldName as in TAVOGroupSet. Neither the files nor the record of the id assigned last are changed.
+ * Fails as TAVOGroupSet does, with the codes of TAVOBDbSet, and with ERR_GROUP_DB_DELETE when the old entries cannot be
+ * deleted.
  */
 TAVO_API int TAVOGroupDBSet(TAVOGROUPDB *pDb, const char *szOldName, const TAVOGROUP *pGroup);
 

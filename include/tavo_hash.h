@@ -3,13 +3,13 @@
  *
  * The block holds the header, an open-addressing table and copies of all keys and values, so one TLIBSzHashFree
  * releases everything. Keys are compared by bytes. A hash that has to grow moves: functions that can add text take the
- * address of the caller's pointer, replace it and free the old block. A string handed out points into the block and is
- * valid until the next call that may grow or rebuild the hash, or frees it; it may be passed to that very call.
+ * address of the caller's pointer, replace it and free the old block. A returned string points into the block and is
+ * valid until the next call that may grow, rebuild or free the hash; it may be passed to that call.
  *
- * The hash function adds up the words of a key. It is fast and stable, not strong: whoever chooses the keys can make
- * them collide, so limit how many keys are taken from the network.
+ * The hash function adds up the words of a key. It is fast and stable, not strong: a sender who chooses the keys can
+ * make them collide, so limit how many keys are taken from the network.
  *
- * A hash belongs to one thread at a time; nothing is locked. A code is recorded only with the failures that name one.
+ * A hash belongs to one thread at a time; nothing is locked. A code is recorded only for failures that name one.
  */
 #ifndef TAVO_HASH_H
 #define TAVO_HASH_H
@@ -31,7 +31,7 @@ typedef struct TLIBSZHASHSLOT {
 #endif
 
 typedef struct TLIBSZHASH {
-    int32_t nStrSize; /* bytes of the string area, which stands behind the slots */
+    int32_t nStrSize; /* bytes of the string area, which follows the slots */
     int32_t nStrFree; /* bytes of it that are free; a removed or replaced text keeps its bytes until the next rebuild */
     int32_t nSlot;    /* slots of the table */
     int32_t nPair;    /* keys present */
@@ -43,8 +43,8 @@ typedef struct TLIBSZHASH {
 #pragma clang diagnostic pop
 #endif
 
-/* Makes an empty hash of 31 slots and cbStr bytes for text. The caller frees it with TLIBSzHashFree.
- * NULL with the codes of PshTLIBIHashAllocator. */
+/* Creates an empty hash of 31 slots and cbStr bytes for text. The caller frees it with TLIBSzHashFree.
+ * Returns NULL with the codes of PshTLIBIHashAllocator. */
 TAVO_API TLIBSZHASH *PshTLIBSzHashAlloc(int cbStr);
 
 /* The same with nSlot slots. NULL with
@@ -55,7 +55,8 @@ TAVO_API TLIBSZHASH *PshTLIBIHashAllocator(int nSlot, int cbStr);
 /* Frees the hash with all its strings. NULL is ignored. */
 TAVO_API void TLIBSzHashFree(TLIBSZHASH *pHash);
 
-/* The value of szKey, in the hash. NULL, without a code: the key is missing or an argument is NULL. */
+/* Returns the value of szKey, which points into the hash. NULL, without a code: the key is missing or an argument is
+ * NULL. */
 TAVO_API char *SzTLIBSzHashGetValue(const TLIBSZHASH *pHash, const char *szKey);
 
 /* Sets the value of szKey to a copy of szValue, adding the key when it is missing.
@@ -63,7 +64,7 @@ TAVO_API char *SzTLIBSzHashGetValue(const TLIBSZHASH *pHash, const char *szKey);
  * cannot grow. */
 TAVO_API int TLIBSzHashSetValue(TLIBSZHASH **ppHash, const char *szKey, const char *szValue);
 
-/* Removes szKey and returns its value, which still stands in the hash's block. NULL, without a code: as
+/* Removes szKey and returns its value, which is still in the hash's block. NULL, without a code: as
  * SzTLIBSzHashGetValue. */
 TAVO_API char *SzTLIBSzHashRemoveKey(TLIBSZHASH *pHash, const char *szKey);
 
@@ -89,17 +90,17 @@ TAVO_API int TLIBSzHashGetLength(const TLIBSZHASH *pHash);
  * modulo nSlot; 0 for an empty key. -1: szKey is NULL or nSlot is not positive. */
 TAVO_API int TLIBIRadixHashCode(const char *szKey, int nSlot);
 
-/* The slot that holds szKey; -1: none, or an argument is NULL. */
+/* Returns the slot that holds szKey; -1: no slot does, or an argument is NULL. */
 TAVO_API int TLIBIGetLookDict(const TLIBSZHASH *pHash, const char *szKey);
 
-/* The slot that holds szKey, else its home slot when that was never used, else the first slot of a removed pair behind
- * its home slot. -1: none of these before the first slot that was never used, or an argument is NULL. It does not offer
- * that never used slot; TLIBSzHashSetValue then takes the home slot of a removed pair or that slot by itself. */
+/* Returns the slot that holds szKey, else its home slot when that was never used, else the first slot of a removed pair
+ * after its home slot. -1: none of these before the first slot that was never used, or an argument is NULL. The never
+ * used slot itself is not returned; TLIBSzHashSetValue then takes the home slot of a removed pair or that slot. */
 TAVO_API int TLIBISetLookDict(const TLIBSZHASH *pHash, const char *szKey);
 
-/* Makes room for one more pair of cbNeed bytes (both NULs counted). More than three quarters of the slots in use: the
- * table grows to 4 * nSlot - 5 slots. Not more than cbNeed bytes free: the string area grows. Returns the block, which
- * is a new one when something grew (the old one is then freed); NULL: it cannot grow and is as it was. */
+/* Makes room for one more pair of cbNeed bytes (both NULs counted). The table grows to 4 * nSlot - 5 slots when more
+ * than three quarters are in use; the string area grows when no more than cbNeed bytes are free. Returns the block,
+ * which is a new one when something grew (the old one is then freed); NULL: it cannot grow and has not changed. */
 TAVO_API TLIBSZHASH *PshTLIBICheckSpace(TLIBSZHASH *pHash, int cbNeed);
 
 /* Moves all pairs to a new block of nSlot slots and cbStr bytes for text, and frees the old block. NULL, and the old
@@ -107,16 +108,16 @@ TAVO_API TLIBSZHASH *PshTLIBICheckSpace(TLIBSZHASH *pHash, int cbNeed);
 TAVO_API TLIBSZHASH *PshTLIBIReSizeHash(TLIBSZHASH *pHash, int nSlot, int cbStr);
 
 /* Adds every pair of pFrom to pTo, in slot order, without growing pTo.
- * Returns 0; -1: an argument is NULL, or a pair does not fit or its key is there already; the pairs before that one
+ * Returns 0; -1: an argument is NULL, or a pair does not fit or its key exists already; the pairs before that one
  * have been added. */
 TAVO_API int TLIBICopyHash(TLIBSZHASH *pTo, const TLIBSZHASH *pFrom);
 
-/* Stores a new pair in the slot, which holds none, without growing. Returns the slot; -1: an argument is NULL, the slot
+/* Stores a new pair in a slot without a pair, without growing. Returns the slot; -1: an argument is NULL, the slot
  * is not free, or there is no room for the text. */
 TAVO_API int TLIBIInsertPair(TLIBSZHASH *pHash, int slot, const char *szKey, const char *szValue);
 
 /* Adds the pair of a key that the hash does not hold, growing when needed. Returns the block, which replaces pHash, and
- * the slot in *pSlot; NULL: a NULL argument, or the hash cannot grow and is as it was. */
+ * the slot in *pSlot; NULL: a NULL argument, or the hash cannot grow and has not changed. */
 TAVO_API TLIBSZHASH *PshTLIBIInsertNewPair(TLIBSZHASH *pHash, int *pSlot, const char *szKey, const char *szValue);
 
 /* Replaces the value in *pSlot, the slot of szKey; in place when szValue is not longer. Returns and grows as

@@ -3,16 +3,16 @@
  *
  * The block holds the header, the item table and copies of all strings, so one TLIBSzListFree releases everything.
  * A list that has to grow moves: functions that can add text take the address of the caller's pointer, replace it
- * and free the old block. A string handed out points into the block and is valid until the next call that may grow or
- * rebuild the list, or frees it; it may be passed to that very call, also when the call moves the block.
+ * and free the old block. A returned string points into the block and is valid until the next call that may grow,
+ * rebuild or free the list; it may be passed to that call, also when the call moves the block.
  *
  * Sizes are counted in 32-bit words on every target: the header counts 24 bytes and an item slot 4. On a 64-bit host
  * the block is physically larger than nSize says, and every list grows at the same insertion as on the appliance.
  *
- * A block whose nSize is smaller than the header was overwritten or never made: what would have to grow it refuses it as
- * it refuses NULL, with ERR_BAD_PARAMETERS.
+ * A block whose nSize is smaller than the header was overwritten or never initialised: functions that would have to
+ * grow it fail with ERR_BAD_PARAMETERS, as for NULL.
  *
- * A list belongs to one thread at a time; nothing is locked. Indexes begin at 0. A code is recorded only with the
+ * A list belongs to one thread at a time; nothing is locked. Indexes begin at 0. A code is recorded only for
  * failures that name one.
  */
 #ifndef TAVO_LIST_H
@@ -22,14 +22,14 @@
 
 TAVO_BEGIN_DECLS
 
-/* Values of fMode: in what order the items are kept. */
+/* Values of fMode: the order of the items. */
 enum {
     TLIB_SZLIST_UNSORTED = 0x00,
     TLIB_SZLIST_SORTED = 0x01,    /* by bytes, as strcmp does */
     TLIB_SZLIST_CASESORTED = 0x10 /* by UTF-8 text without regard to case, as TLIBUnicodeUTF8StrCaseCmp does */
 };
 
-/* Flag of the set operations: give the result in a new list. */
+/* Flag of the set operations: return the result in a new list. */
 enum { TLIB_SZLIST_NEW = 0x1000 };
 
 #ifdef __clang__
@@ -42,7 +42,7 @@ typedef struct TLIBSZLIST {
     int32_t nItem; /* item slots in use */
     int32_t nFree; /* nSize - 24 - 4 * nItem - bytes of the stored strings; a removed or replaced string keeps its bytes
                       until the list grows or is emptied */
-    int32_t fMode; /* a TLIB_SZLIST_ mode, or any other value that TLIBSzListSortItems was given: not sorted */
+    int32_t fMode; /* a TLIB_SZLIST_ mode; any other value that was passed to TLIBSzListSortItems: not sorted */
     char *EndofFree; /* lowest address in use by a string; strings are packed downward from the end of the block */
     char *pszEmpty;  /* the block's last byte, always 0: what the slot of a hole points to */
     __extension__ char *pszItem[]; /* nItem pointers to strings in this block */
@@ -52,22 +52,22 @@ typedef struct TLIBSZLIST {
 #pragma clang diagnostic pop
 #endif
 
-/* Makes an empty, unsorted list of cbSize bytes; less than 512 becomes 512. The caller frees it with TLIBSzListFree.
- * NULL with ERR_OUT_OF_MEMORY. */
+/* Creates an empty, unsorted list of cbSize bytes, at least 512. The caller frees it with TLIBSzListFree.
+ * Returns NULL with ERR_OUT_OF_MEMORY. */
 TAVO_API TLIBSZLIST *PslTLIBSzListAlloc(int cbSize);
 
 /* Frees the list with all its strings. NULL is ignored. */
 TAVO_API void TLIBSzListFree(TLIBSZLIST *pList);
 
-/* The item at index i, the empty string for a hole. Points into the list.
+/* Returns the item at index i, which points into the list; the empty string for a hole.
  * NULL with ERR_BAD_PARAMETERS: pList is NULL, or there is no such index. */
 TAVO_API char *SzTLIBSzListGet(const TLIBSZLIST *pList, int i);
 
 /* Inserts a copy of sz at index i and moves the items from there on up by one. An index beyond the end leaves holes
- * in between. A sorted list ignores i and takes the place of the order; a copy of an equal item goes before it.
+ * in between. A sorted list ignores i and inserts the copy at its place in the order, before an equal item.
  * Returns the index of the new item, or -1 with
  *   ERR_BAD_PARAMETERS  ppList, *ppList or sz is NULL, or i is negative
- *   ERR_OUT_OF_MEMORY   the list cannot grow; it is as it was */
+ *   ERR_OUT_OF_MEMORY   the list cannot grow; it has not changed */
 TAVO_API int TLIBSzListInsert(TLIBSZLIST **ppList, int i, const char *sz);
 
 /* TLIBSzListInsert at the end; the same results. */
@@ -76,14 +76,14 @@ TAVO_API int TLIBSzListPush(TLIBSZLIST **ppList, const char *sz);
 /* TLIBSzListInsert at the beginning; the same results. */
 TAVO_API int TLIBSzListUnshift(TLIBSZLIST **ppList, const char *sz);
 
-/* Takes the item at index i out and returns it; the string still stands in the list's block.
+/* Removes the item at index i and returns it; the string is still in the list's block.
  * NULL with ERR_BAD_PARAMETERS: pList is NULL, or there is no such index. */
 TAVO_API char *SzTLIBSzListRemove(TLIBSZLIST *pList, int i);
 
-/* Takes the first item out; as SzTLIBSzListRemove. */
+/* Removes the first item; returns as SzTLIBSzListRemove. */
 TAVO_API char *SzTLIBSzListShift(TLIBSZLIST *pList);
 
-/* Takes the last item out; as SzTLIBSzListRemove. */
+/* Removes the last item; returns as SzTLIBSzListRemove. */
 TAVO_API char *SzTLIBSzListPop(TLIBSZLIST *pList);
 
 /* Empties the list and makes its whole block free again. Mode and size stay. NULL is ignored. */
@@ -92,9 +92,9 @@ TAVO_API void TLIBSzListRemoveAll(TLIBSZLIST *pList);
 /* Replaces the item at index i by a copy of sz; in place when sz is not longer. A sorted list is sorted again.
  * Returns the index of the new item, or -1 with
  *   ERR_BAD_PARAMETERS  ppList, *ppList or sz is NULL, or there is no such index; nothing has changed. Also for a list
- *                       of mode TLIB_SZLIST_CASESORTED, where TLIBSzListFind is asked for the new index and refuses:
- *                       there the replacement is done, and the list sorted again
- *   ERR_OUT_OF_MEMORY   the list cannot grow; it is as it was */
+ *                       of mode TLIB_SZLIST_CASESORTED, in which TLIBSzListFind cannot look up the new index: there the
+ *                       replacement is done, and the list sorted again
+ *   ERR_OUT_OF_MEMORY   the list cannot grow; it has not changed */
 TAVO_API int TLIBSzListSet(TLIBSZLIST **ppList, int i, const char *sz);
 
 /* Finds sz by bytes; a binary search in a sorted list. Holes are never found in an unsorted list.
@@ -108,7 +108,7 @@ TAVO_API int TLIBSzListCaseFind(const TLIBSZLIST *pList, const char *sz);
 
 /* Sets the list's mode. An unsorted list (mode 0) is sorted first, and its holes dropped: by bytes when bit 0x01 of
  * mode is set, else without regard to case when bit 0x10 is; equal items in no particular order, text that is not
- * UTF-8 behind all other by bytes. Any other list is only relabelled: its order stays. NULL is ignored. */
+ * UTF-8 last, bytewise. Any other list only gets the new mode and keeps its order. NULL is ignored. */
 TAVO_API void TLIBSzListSortItems(TLIBSZLIST *pList, int mode);
 
 /* The list's mode. -1 with ERR_BAD_PARAMETERS: pList is NULL. */
@@ -138,9 +138,9 @@ TAVO_API TLIBSZLIST *PslTLIBSzListOr(TLIBSZLIST **ppA, const TLIBSZLIST *pB, int
 /* The items of pA that are not in pB. */
 TAVO_API TLIBSZLIST *PslTLIBSzListSub(TLIBSZLIST *pA, const TLIBSZLIST *pB, int fFlags);
 
-/* Joins the items with szSep between them into szBuf of cbBuf bytes. What does not fit is cut at cbBuf - 1 bytes; the
- * text always ends in NUL and the rest of the buffer is cleared.
- * Returns 0 or more when the whole text fits: a mark of success and not a length. -1 with
+/* Joins the items with szSep between them into szBuf of cbBuf bytes. Text that does not fit is cut at cbBuf - 1 bytes;
+ * it always ends in NUL and the rest of the buffer is cleared.
+ * Returns 0 or more, which is not a length, when the whole text fits. -1 with
  *   ERR_BAD_PARAMETERS  an argument is NULL or cbBuf is not positive; also logged
  *   ERR_TRUNCATED       the text was cut */
 TAVO_API int TLIBSzListDump2Str(const TLIBSZLIST *pList, const char *szSep, char *szBuf, int cbBuf);
@@ -148,8 +148,8 @@ TAVO_API int TLIBSzListDump2Str(const TLIBSZLIST *pList, const char *szSep, char
 /* Prints the list's addresses, items and header to standard output, for debugging. NULL is ignored. */
 TAVO_API void TLIBISzListDump(const TLIBSZLIST *pList);
 
-/* Binary search for sz among the items lo to hi: by bytes, or without regard to case when fCase is set. Text that is
- * not UTF-8 ends a case search where it is met. Bounds outside the list are drawn in.
+/* Binary search for sz among the items lo to hi: by bytes, or without regard to case when fCase is set. A case
+ * search ends at the first item that is not UTF-8. Bounds outside the list are moved to its ends.
  * Returns an index, or -(place + 1) where place is where sz would be inserted; -1 when hi is -1. -1 with
  * ERR_BAD_PARAMETERS: an argument is NULL. */
 TAVO_API int TLIBISzListFind(const TLIBSZLIST *pList, int hi, int lo, const char *sz, int fCase);
@@ -158,13 +158,13 @@ TAVO_API int TLIBISzListFind(const TLIBSZLIST *pList, int hi, int lo, const char
 TAVO_API void TLIBISzListClean(TLIBSZLIST *pList);
 
 /* Copies the list into a new block of twice the size, without the bytes of removed strings, and frees the old block.
- * NULL, and the old block as it was, with
+ * Returns NULL, the old block unchanged, with
  *   ERR_BAD_PARAMETERS  pList is NULL
  *   ERR_OUT_OF_MEMORY   no memory, or the size would pass 2^31 - 1 */
 TAVO_API TLIBSZLIST *PslTLIBISzListExpand(TLIBSZLIST *pList);
 
-/* The two orders, for qsort: each argument is the address of an item pointer. The second puts text that is not UTF-8
- * behind all other, by bytes. */
+/* The two orders, for qsort: each argument is the address of an item pointer. The second sorts text that is not
+ * UTF-8 last, bytewise. */
 TAVO_API int TLIBISzListStrcmp(const void *pLeft, const void *pRight);
 TAVO_API int TLIBISzListUTF8StrCasecmp(const void *pLeft, const void *pRight);
 

@@ -8,16 +8,16 @@
  *     ...
  *     ErrTLIBFileUnlock(TAVO_LOCK_TAVOINFO);
  *
- * Locks nest within one process: each is released by as many unlocks as there were locks. Locks of different processes
- * exclude each other, threads of one process do not. A process that ends, however it ends, holds nothing any more.
+ * Locks nest within one process: each needs as many unlocks as there were locks. Processes exclude each other, threads
+ * of one process do not. When a process ends, in whatever way, its locks are released.
  *
- * The locks are flock(2) locks on the files /tmp/lock/lock_*. They belong to the open file, which a forked child shares:
- * a child calls ErrTLIBFileCloseLock or ErrTLIBFileResetLock first and never ErrTLIBFileUnlock, which would free what
- * its parent holds. Programs that are executed inherit nothing, the files are close-on-exec.
+ * The locks are flock(2) locks on the files /tmp/lock/lock_*. They belong to the open file, which a forked child
+ * shares: a child first calls ErrTLIBFileCloseLock or ErrTLIBFileResetLock, never ErrTLIBFileUnlock, which would
+ * release the parent's locks. Executed programs inherit none, because the files are close-on-exec.
  *
- * Only the owner of a lock file may open it (mode 0600), because everybody who can open a file can hold its lock. On the
- * appliance that owner is root, so a program of another user takes no lock: its requests fail at once with
- * ERR_LOCK_FAILED, and so does every function of the library that needs a lock, those that only read included.
+ * Only the owner of a lock file may open it (mode 0600), because everybody who can open a file can hold its lock. On
+ * the appliance that owner is root, so the requests of another user's program fail at once with ERR_LOCK_FAILED. So
+ * does every function of the library that needs a lock, including those that only read.
  *
  * A request that fails names the lock in the system log, with the process id and the name of a holder if /proc/locks
  * shows one.
@@ -34,11 +34,11 @@
 TAVO_BEGIN_DECLS
 
 /*
- * A request combines the locks that are wanted with one way to take them. A request for several locks takes all or none.
+ * A request combines the wanted locks with one way to take them. A request for several locks takes all or none.
  *
- * TAVO_LOCK_HOST is what the settings of the network interfaces are edited under; TAVO_LOCK_NETWORK is another lock.
+ * TAVO_LOCK_HOST protects the settings of the network interfaces; TAVO_LOCK_NETWORK is another lock.
  * The services take TAVO_LOCK_TAVOINFO, TAVO_LOCK_SMB and TAVO_LOCK_APPLE together and hold them while start-up scripts
- * run: such a script must not run a program that takes one of these locks, it would wait until its time-out.
+ * run: such a script must not run a program that takes one of these locks, because it would wait until its time-out.
  */
 /* clang-format off */
 enum {
@@ -79,46 +79,46 @@ typedef struct TLIBLOCKFILE {
 } TLIBLOCKFILE;
 
 /* The locks of this process, in the order in which a request takes them. The last record has an empty path and the bit
- * 0. For looking at: a program that writes to it breaks its own locks, and nobody else's. */
+ * 0. Do not write to it: that breaks the locks of this process, though not those of others. */
 extern TAVO_API TLIBLOCKFILE rgslckList[21];
 
-/* Takes every lock of the request, first those that stand earlier in rgslckList. A lock that this process holds already
- * is counted once more, whatever the mode of the request, except that a shared one does not become exclusive: such a
- * request fails at once and changes nothing.
+/* Takes every lock of the request in the order of rgslckList. A lock that this process holds already is counted once
+ * more, whatever the mode of the request; but a shared lock does not become exclusive: such a request fails at once and
+ * changes nothing.
  * timeout: seconds for which a request with TAVO_LOCK_NONBLOCKING is tried again, every 50 milliseconds (20 times a
  * second); 0 or less means one attempt.
  * Creates /tmp/lock (mode 0755) and the lock files (mode 0600) when they are missing. A lock file that was replaced
  * while it was waited for (by a cleaner of /tmp) is opened again, so that all holders hold the same file.
  * Returns 0, or -1 with nothing taken and
- *   ERR_LOCK_FAILED    not all of the locks could be had in time; or, at once, the caller may not open a lock file, a
- *                      shared lock would have to become exclusive, or the request names no way or an impossible one to
- *                      take them
+ *   ERR_LOCK_FAILED    not all of the locks became free in time; or, at once, the caller may not open a lock file, a
+ *                      shared lock would have to become exclusive, or the request does not name one valid way to take
+ *                      them
  *   ERR_CREATE_FAILED, ERR_OPEN_FAILED  as ErrTLIBILockCheckDir */
 TAVO_API int ErrTLIBFileLock(unsigned int request, int timeout);
 
-/* Releases the locks of mask that this process holds, each once; the low four bits do not count, so the request itself
- * will do. Locks that are not held are passed over.
- * Returns 0, or -1 with ERR_UNLOCK_FAILED when the kernel refused to unlock a file; it is closed all the same. */
+/* Releases the locks of mask that this process holds, each once; the low four bits are ignored, so the request itself
+ * can be passed. Locks that are not held are skipped.
+ * Returns 0, or -1 with ERR_UNLOCK_FAILED when the kernel refused to unlock a file; the file is closed anyway. */
 TAVO_API int ErrTLIBFileUnlock(unsigned int mask);
 
-/* For a freshly forked child: closes every lock file and forgets every count. The parent keeps its locks.
- * Returns 0, or -1 with ERR_UNLOCK_FAILED when a close failed; all are closed all the same. */
+/* For a freshly forked child: closes every lock file and resets every count. The parent keeps its locks.
+ * Returns 0, or -1 with ERR_UNLOCK_FAILED when a close failed; the others are closed anyway. */
 TAVO_API int ErrTLIBFileCloseLock(void);
 
 /* For a freshly forked child that takes over some of its parent's locks: those of mask are counted once, all others
- * are closed and forgotten. Of a lock that is taken over, the file stays locked until both processes have closed it.
- * Returns 0, or -1 with ERR_UNLOCK_FAILED when a close failed; all are closed all the same. */
+ * are closed. The file of a lock that is taken over stays locked until both processes have closed it.
+ * Returns 0, or -1 with ERR_UNLOCK_FAILED when a close failed; the others are closed anyway. */
 TAVO_API int ErrTLIBFileResetLock(unsigned int mask);
 
-/* Creates /tmp/lock and every lock file that is missing, and takes the permissions of group and others from those that
- * are not. ErrTLIBFileLock does so itself.
- * Everybody may create names in /tmp, so the directory must belong to root or to the caller and be writable to its owner
- * alone, and a lock file must be a regular file of one of the two; a symbolic link is never followed. For root, anything
- * at /tmp/lock that does not belong to root is renamed to "/tmp/lock.foreign-" and 16 random digits, which is logged,
- * and the directory is created in its place.
+/* Creates /tmp/lock and every lock file that is missing, and removes the permissions of group and others from the
+ * existing ones. ErrTLIBFileLock does so itself.
+ * Everybody may create names in /tmp. So the directory must belong to root or to the caller and be writable only by its
+ * owner, and a lock file must be a regular file of one of the two; a symbolic link is never followed. For root,
+ * anything at /tmp/lock that does not belong to root is renamed to "/tmp/lock.foreign-" and 16 random digits, which is
+ * logged, and the directory is created in its place.
  * Returns 0, or -1 with
- *   ERR_CREATE_FAILED  /tmp/lock cannot be created, is not a directory, or is not to be trusted
- *   ERR_OPEN_FAILED    a lock file cannot be created, is not a regular file, or is not to be trusted
+ *   ERR_CREATE_FAILED  /tmp/lock cannot be created, is not a directory, or fails these checks
+ *   ERR_OPEN_FAILED    a lock file cannot be created, is not a regular file, or fails these checks
  *   ERR_OUT_OF_MEMORY */
 TAVO_API int ErrTLIBILockCheckDir(void);
 

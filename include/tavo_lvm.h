@@ -2,11 +2,11 @@
  * LVM: physical volumes, volume groups and logical volumes on the data arrays.
  *
  * On models with RAID every data array is a physical volume; those of one storage space form a volume group, whose path
- * starts with "/dev/vg", and one logical volume fills it. Without RAID there is no LVM: the readers find nothing then, and
- * run no tool.
+ * starts with "/dev/vg", and one logical volume fills it. Without RAID there is no LVM: the reading functions then find
+ * nothing and run no tool.
  *
- * A physical volume is "/dev/" and a kernel name. A volume group is "/dev/vg" and letters, digits, "_.+-". Other text is
- * refused before any program runs. All is done by the LVM tools. Nothing is locked. Failures are logged; a code is
+ * A physical volume is "/dev/" and a kernel name. A volume group is "/dev/vg" and letters, digits, "_.+-". Other text
+ * is refused before any program runs. The LVM tools do all the work. Nothing is locked. Failures are logged; a code is
  * recorded only where one is named.
  */
 #ifndef TAVO_LVM_H
@@ -53,47 +53,48 @@ typedef struct LVMVGKEY {
     const char *szPv;
 } LVMVGKEY;
 
-/* Whether the model uses LVM: 1 or 0. */
+/* Returns 1 when the model uses LVM, else 0. */
 TAVO_API int LVMIsSupport(void);
 
 /* --- physical volumes --- */
 
-/* Makes a physical volume; what is on the device is lost. Returns 0 or -1.
+/* Makes a physical volume; the data on the device is lost. Returns 0 or -1.
  * Runs: /sbin/pvcreate */
 TAVO_API int LVMPvCreate(const char *szDevice);
 
-/* Has every physical volume of the group use the whole of its device. Returns 0; -1 when one failed, the others are grown
- * all the same.
+/* Grows every physical volume of the group to the size of its device. Returns 0; -1 when one failed, after the others
+ * have been grown.
  * Runs: /sbin/pvresize */
 TAVO_API int LVMPvExpand(const LVMVGINFO *pInfo);
 
-/* Reads one physical volume into the caller's record: 1; 0 when the device is none; -1. The record is only written with
- * 1.
+/* Reads one physical volume into the caller's record. Returns 1; 0 when the device is not a physical volume; -1 on
+ * failure. The record is written only when 1 is returned.
  * Runs: /sbin/pvs */
 TAVO_API int LVMPvSBGet(const char *szDevice, LVMPV *pPv);
 
-/* Reads all physical volumes. Returns their number and a list for LVMPvSBListFree, NULL for none; -1 with *ppList NULL.
+/* Reads all physical volumes. Returns their number and stores the list (NULL for none) in *ppList; the caller releases
+ * it with LVMPvSBListFree. Returns -1 with *ppList NULL on failure.
  * Runs: /sbin/pvs */
 TAVO_API int LVMPvSBEnum(LVMPVLIST **ppList);
 
-/* Reads a line "  PV|VG|UUID|COUNT" of pvs. Returns 0; -1, silently and with the record untouched, when it is none. */
+/* Parses a line "  PV|VG|UUID|COUNT" of pvs. Returns 0; -1, silently and with the record untouched, for other text. */
 TAVO_API int LVMPvParseLine(const char *szLine, LVMPV *pPv);
 
 /* Appends a copy of the record. Returns 0 or -1. */
 TAVO_API int LVMPvSBListPush(LVMPVLIST **ppList, const LVMPV *pPv);
 TAVO_API void LVMPvSBListFree(LVMPVLIST *pList);
 
-/* Has the system look for physical volumes anew. Returns 0 or -1.
+/* Scans the system for physical volumes again. Returns 0 or -1.
  * Runs: /sbin/pvscan */
 TAVO_API int LVMPvScan(void);
 
-/* Makes a device no physical volume any more, whatever it belongs to. Returns 0 or -1.
+/* Removes a physical volume, even one that belongs to a group. Returns 0 or -1.
  * Runs: /sbin/pvremove */
 TAVO_API int LVMPvRemove(const char *szDevice);
 
 /* --- volume groups --- */
 
-/* Makes a group of physical volumes. A first failure is tried again. Returns 0 or -1.
+/* Makes a group of physical volumes. After a first failure it tries once more. Returns 0 or -1.
  * Runs: /sbin/vgcreate */
 TAVO_API int LVMVgCreate(const char *szVg, const TLIBSZLIST *pslDevices);
 
@@ -101,43 +102,44 @@ TAVO_API int LVMVgCreate(const char *szVg, const TLIBSZLIST *pslDevices);
  * Runs: /sbin/vgremove, /bin/rm */
 TAVO_API int LVMVgRemove(const char *szVg);
 
-/* Renames a group, given by its path, or when that is NULL by its name. Returns 0 or -1.
+/* Renames a group, given by its path or, when szVg is NULL, by its name. Returns 0 or -1.
  * Runs: /sbin/lvm */
 TAVO_API int LVMVgRename(const char *szVg, const char *szOldName, const char *szNewName);
 
-/* Reads a group: 1; 0 when there is none; -1. The record is only written with 1.
+/* Reads a group. Returns 1; 0 when there is no such group; -1 on failure. The record is written only when 1 is
+ * returned.
  * Runs: /sbin/vgs */
 TAVO_API int LVMVgSBGet(const char *szVg, LVMVG *pVg);
 
-/* An empty record for LVMVgInfoFree; NULL with ERR_OUT_OF_MEMORY. */
+/* Returns an empty record that the caller releases with LVMVgInfoFree; NULL with ERR_OUT_OF_MEMORY. */
 TAVO_API LVMVGINFO *LVMVgInfoAlloc(void);
 TAVO_API void LVMVgInfoFree(LVMVGINFO *pInfo);
 
-/* Fills the record with a group and its physical volumes. Returns 0, or -1 with the record as it was: also for a group
+/* Fills the record with a group and its physical volumes. Returns 0, or -1 with the record unchanged: also for a group
  * without a UUID, which devices outside every group would match. */
 TAVO_API int LVMVgSB2Info(const LVMVG *pVg, LVMVGINFO *pInfo);
 
-/* Finds the first group that has the key's path, or holds its physical volume: 1 and the record, which stays the list's, in
- * *ppFound; 0 without one; -1 for a NULL argument (pList may be NULL). */
+/* Finds the first group that has the key's path or holds its physical volume. Returns 1 and the record, which the list
+ * still owns, in *ppFound; 0 without one; -1 for a NULL argument (pList may be NULL). */
 TAVO_API int LVMVgSBListSearch(const LVMVGLIST *pList, const LVMVGKEY *pKey, LVMVGINFO **ppFound);
 
 /* --- logical volumes --- */
 
-/* Makes the volume that fills the group; what an earlier volume left at that place is wiped. Returns 0 or -1.
+/* Makes the volume that fills the group; signatures of an earlier volume there are wiped. Returns 0 or -1.
  * Runs: /sbin/lvcreate */
 TAVO_API int LVMLvCreate(const char *szVg, const char *szLv);
 
-/* Makes physical volumes of all devices, in order, a group of them, and its volume. The group's UUID goes into szUuid unless
- * that is NULL, cut to cbUuid bytes with the final NUL. Returns 0, or -1 at the first failure.
+/* Makes physical volumes of all devices, in order, a group of them, and its volume. The group's UUID is copied to
+ * szUuid unless that is NULL, cut to cbUuid bytes with the final NUL. Returns 0, or -1 at the first failure.
  * Runs: /sbin/pvcreate, /sbin/vgcreate, /sbin/lvcreate */
 TAVO_API int LVMCreate(const TLIBSZLIST *pslDevices, const char *szVg, const char *szLv, char *szUuid, int cbUuid);
 
-/* Gives the path of the first logical volume on a device, "/dev/vg1/lv": 1; 0 when there is none; -1 when szPath is too
- * small (ERR_NOT_ENOUGH_MEMORY) or an argument is bad. */
+/* Copies the path of the first logical volume on a device, "/dev/vg1/lv", to szPath. Returns 1; 0 when there is none;
+ * -1 when szPath is too small (ERR_NOT_ENOUGH_MEMORY) or an argument is bad. */
 TAVO_API int LVMGetLVPath(const char *szDevice, char *szPath, int cbPath);
 
-/* Removes the logical volume of a device with its mounted snapshots ("lv", "s" and a number), the group and the physical
- * volume. What fails is logged, and the next step taken. Returns 0; -1 for a bad argument.
+/* Removes the logical volume of a device with its mounted snapshots ("lv", "s" and a number), the group and the
+ * physical volume. A step that fails is logged, and the next one follows. Returns 0; -1 for a bad argument.
  * Files: /proc/mounts
  * Runs: /bin/umount, /sbin/lvremove, /sbin/vgremove, /sbin/pvremove */
 TAVO_API int LVMRemoveLV(const char *szDevice);
@@ -146,9 +148,9 @@ TAVO_API int LVMRemoveLV(const char *szDevice);
  * Runs: /sbin/lvremove */
 TAVO_API int LVMRemove(const char *szVg, const char *szKind);
 
-/* Removes every physical volume on a disk or a partition ("/dev/sd"): the appliance has them on arrays alone. USB disks,
- * and groups that reach onto one, stay. Does nothing on a model without LVM. Returns 0; -1 when the physical volumes cannot
- * be listed, or, with nothing changed, when one of them is mounted or otherwise in use, which is logged.
+/* Removes every physical volume on a disk or a partition ("/dev/sd"): the appliance has them on arrays only. USB disks,
+ * and groups that include one, are left alone. Does nothing on a model without LVM. Returns 0; -1 when the physical
+ * volumes cannot be listed, or, with nothing changed, when one of them is mounted or otherwise in use, which is logged.
  * Files: /sys/class/block, /dev/mapper
  * Runs: /sbin/pvs */
 TAVO_API int LVMCleanIllegal(void);

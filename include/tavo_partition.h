@@ -2,10 +2,11 @@
  * Partitions: the layouts that the system disks carry and have carried, and making and removing them.
  *
  * Partition 1 of a system disk holds the system, partition 2 is swap, partition 3 takes the rest for data; on models
- * with RAID each is a member of an array. The exact sectors have changed over the years: every geometry ever shipped
- * stands in grgAllTavoPartLayout and is recognised. The table is an MS-DOS one, so it reaches 2^32 sectors of 512 bytes.
+ * with RAID each is a member of an array. The exact sectors have changed over the years: every geometry ever shipped is
+ * listed in grgAllTavoPartLayout and is recognised. The table is an MS-DOS one, so it reaches 2^32 sectors of 512
+ * bytes.
  *
- * Changes are made by the appliance's own /sbin/sfdisk. A disk is "/dev/sda"; text that is no device name (see
+ * Changes are made by the appliance's own /sbin/sfdisk. A disk is "/dev/sda"; text that is not a device name (see
  * tavo_disk.h) is refused before any program runs. Nothing is locked. All failures are logged; none of these functions
  * records a code itself, but a function of tavo_disk.h that it calls may.
  */
@@ -24,7 +25,7 @@ typedef struct __attribute__((packed)) TAVOPARTPLACE {
     uint32_t nType;  /* of the MS-DOS table */
 } TAVOPARTPLACE;
 
-/* One layout: 92 bytes without padding. Its 64-bit fields may lie on any multiple of 4, so copy them out (memcpy, or a
+/* One layout: 92 bytes without padding. Its 64-bit fields are aligned only to 4 bytes, so copy them out (memcpy, or a
  * plain assignment) and take no pointer to them. */
 typedef struct __attribute__((packed)) TAVOPARTLAYOUT {
     int32_t nVersion;
@@ -50,11 +51,11 @@ typedef struct PARTTYPE {
 /* Every type that has a name; the last row ends the table. */
 extern TAVO_API const PARTTYPE PartType[49];
 
-/* The layout version of new disks when nothing else is known. */
+/* The layout version of new disks when no other version is recognised. */
 enum { PARTITION_VERSION_CURRENT = 7 };
 
 /* What PartitionCreate makes. Create the two in two calls, system first: with both flags only the data partition is
- * made, and PARTITION_SYSTEM writes an empty table first, so that an existing data partition is gone. */
+ * made, and PARTITION_SYSTEM writes an empty table first, so that an existing data partition is removed. */
 enum {
     PARTITION_SYSTEM = 1, /* partitions 1 and 2; for PartitionClean too */
     PARTITION_DATA = 2    /* partition 3; for PartitionClean partitions 3 to 15 */
@@ -74,28 +75,29 @@ typedef struct PARTITIONFILTER {
  * Runs: /sbin/sfdisk */
 TAVO_API int BlTAVOCheckPartitionLayout(const char *szDisk, int fRaid, int *pVersion);
 
-/* The index of the layout in grgAllTavoPartLayout; version 0 stands for the current one. -1, silently, without one. */
+/* Returns the index of the layout in grgAllTavoPartLayout; version 0 means the current one. -1, silently, when there is
+ * no such layout. */
 TAVO_API int TAVOPartitionLayoutIdxGet(int version, int fRaid);
 
-/* Gives the layout version of the system disks: that of a member of the system array /dev/md0; without such members that
- * of an internal disk; PARTITION_VERSION_CURRENT when none is recognised. Returns 0, or -1 when /sys/block/md0 cannot be
- * searched or pVersion is NULL.
+/* Finds the layout version of the system disks: that of a member of the system array /dev/md0; without such members
+ * that of an internal disk; PARTITION_VERSION_CURRENT when none is recognised. Returns 0, or -1 when /sys/block/md0
+ * cannot be searched or pVersion is NULL.
  * Files: /sys/block/md0/md
  * Runs: /sbin/sfdisk */
 TAVO_API int PartitionLayoutGet(int *pVersion);
 
-/* Creates partitions. flags are PARTITION_SYSTEM, PARTITION_DATA, see there (0: nothing is made); pVersion may be NULL for the version that
- * the system carries. What is on the disk is lost. Returns 0 or -1; nothing is changed while something uses the disk
- * (PARTITION_DATA: partition 3), which is logged.
+/* Creates partitions. flags are PARTITION_SYSTEM and PARTITION_DATA (0: nothing is made); pVersion may be NULL for the
+ * version of the system disks. The data on the disk is lost. Returns 0 or -1. While the disk is in use (PARTITION_DATA:
+ * partition 3) nothing is changed and the use is logged.
  * Files: /sys/class/block
  * Runs: /sbin/sfdisk */
 TAVO_API int PartitionCreate(const char *szDisk, int flags, const int *pVersion);
 
 /* Empties entries of the table and erases RAID superblocks of the partitions. PARTITION_DATA empties partitions 15 down
- * to 3 (one that is not there is passed over) and erases the superblock of partition 3; PARTITION_SYSTEM does both for
+ * to 3 (missing ones are skipped) and erases the superblock of partition 3; PARTITION_SYSTEM does both for
  * partitions 1 and 2 and leaves an empty table, without partition 3 too. The superblock of another partition that is
- * emptied is erased first. Returns 0 or -1; nothing is changed while something uses one of the partitions that the call
- * empties (PARTITION_SYSTEM empties all), which is logged.
+ * emptied is erased first. Returns 0 or -1. While one of the partitions that the call empties (PARTITION_SYSTEM empties
+ * all) is in use nothing is changed and the use is logged.
  * Files: /sys/class/block
  * Runs: /sbin/sfdisk, /sbin/mdadm */
 TAVO_API int PartitionClean(const char *szDisk, int flags);
@@ -113,20 +115,22 @@ TAVO_API int PartitionAddTable(const char *szDisk);
  * Runs: /sbin/sfdisk */
 TAVO_API int64_t RCPartitionConfigs(int nPartition, const char *szDisk, int64_t *pnStart, uint32_t *pnType);
 
-/* Returns 1 when the partition szPath ("/dev/sda4") is of type 0x0F, extended, else 0. Types 0x05 and 0x85 do not count. */
+/* Returns 1 when the partition szPath ("/dev/sda4") is of type 0x0F, extended, else 0. Types 0x05 and 0x85 do not
+ * count. */
 TAVO_API int PartitionIsExtended(const char *szPath);
 
-/* Gives the kind of the partition table, PARTITION_TABLE_, into *pKind. Every call leaves a line in the log. Returns 0,
- * or -1 when the first sector cannot be read. Entry 3 of the table is not looked at. */
+/* Stores the kind of the partition table, PARTITION_TABLE_, in *pKind. Every call writes a line to the log. Returns 0,
+ * or -1 when the first sector cannot be read. Entry 3 of the table is not read. */
 TAVO_API int PartitionTableTypeGet(const char *szPath, int *pKind);
 
 /* Sorts the caller's list *ppList and adds the paths of all disks and partitions of /proc/partitions that pass the
- * filter. The list may move. Returns the number of items of the list, or -1 (the list may hold a part).
+ * filter. The list may move. Returns the number of items of the list, or -1 (the list may then hold a part of the
+ * paths).
  * Files: /proc/partitions */
 TAVO_API int PartitionPathEnum(const PARTITIONFILTER *pFilter, TLIBSZLIST **ppList);
 
-/* Returns the partition index that holds the data of a known USB device with a fixed layout, -1 for any other device.
- * The source is the USB device that the disk hangs on in /sys. */
+/* Returns the number of the partition that holds the data of a known USB device with a fixed layout, -1 for any other
+ * device. The source is the USB device of the disk in /sys. */
 TAVO_API int TAVOCheckSpecialDevice(const char *szDisk);
 
 TAVO_END_DECLS

@@ -1,11 +1,12 @@
 /*
- * Programs and processes: runs a program and tells how it ended, signals a daemon through its pid file, finds processes.
+ * Programs and processes: running programs and reading their exit status, signalling daemons through their pid files,
+ * finding processes.
  *
- * Status: where a function returns the status of a program, that is its exit code (0 to 255); -1 when it was killed by a
- * signal or could not be started or waited for; 0 when somebody else in this process collected it first, so that its
- * code is not known.
+ * Status: functions that return the status of a program return its exit code (0 to 255); -1 when it was killed by a
+ * signal or could not be started or waited for; 0 when other code of this process collected it first, so that its code
+ * is not known.
  *
- * Programs are given by their path, PATH is not searched. No program inherits a lock of tavo_lock.h. The functions are
+ * Programs are named by their path; PATH is not searched. No program inherits a lock of tavo_lock.h. The functions are
  * for single-threaded callers: they change the process-wide action of SIGCHLD while they run (an ignored SIGCHLD, or
  * SA_NOCLDWAIT, would hide the program's status) and put it back afterwards.
  */
@@ -19,13 +20,14 @@
 TAVO_BEGIN_DECLS
 
 /* Runs a command line through the shell, as system(3), with the caller's environment. Never pass text that came from
- * outside the program: the shell takes it for commands.
- * Returns what system(3) returns, a wait status and no exit code; 0 for NULL, without running anything. Sets no code.
+ * outside the program: the shell would run it as commands.
+ * Returns the wait status (not the exit code) that system(3) returns; 0 for NULL, without running anything. Sets no
+ * code.
  * Runs: /bin/sh */
 TAVO_API int TLIBSystem(const char *szCommand);
 
-/* Runs a program and waits for its end. After szProgram follow its arguments (const char *), at most four, the list ended
- * by NULL; with four arguments the NULL may be left out.
+/* Runs a program and waits for its end. szProgram is followed by at most four arguments (const char *) and NULL; with
+ * four arguments the NULL may be left out.
  * The program runs in a session of its own, in the directory "/", with /dev/null as standard input, output and error,
  * with no environment but the caller's PATH, every signal at its default and none blocked. Other descriptors that the
  * caller has not marked close-on-exec are inherited.
@@ -40,15 +42,15 @@ TAVO_API int TLIBExecv(const char *szProgram, char *const rgszArg[], int fWait);
 
 /* Starts a daemon and does not wait for it. The arguments are passed as to TLIBExec. It has a session of its own,
  * /dev/null as standard input, output and error, no other descriptor, and keeps the caller's directory and environment.
- * Returns its pid, which the caller collects with wait(2) one day; a program that could not be executed has such a pid
- * too and ends by SIGABRT at once. -1 with ERR_OP_FAILURE when no process could be started. */
+ * Returns its pid, which the caller must collect with wait(2) later; a program that could not be executed also has a
+ * pid and ends by SIGABRT at once. -1 with ERR_OP_FAILURE when no process could be started. */
 TAVO_API pid_t TLIBBackgroundExec(const char *szProgram, ...);
 
-/* As TLIBExec, with at most 30 arguments, for at most cSeconds seconds from the call on. When they have passed, the
- * program and the process group that it leads get SIGTERM and at once SIGKILL. One that does not die within a second,
- * because it waits for a disk that does not answer, is left; a later call that starts a program collects it.
- * The child is a copy of the caller, so that a program that cannot be read from its disk does not hold the caller up: a
- * caller with much memory pays more for this function than for the others.
+/* As TLIBExec, with at most 30 arguments, for at most cSeconds seconds from the call on. After that, the
+ * program and the process group that it leads get SIGTERM and at once SIGKILL. A program that does not die within a
+ * second, because it waits for a disk that does not answer, is left; a later call that starts a program collects it.
+ * The child is a copy of the caller, so that the caller does not wait for a program that cannot be read from its disk.
+ * A caller with much memory therefore pays more for this function than for the others.
  * The first call installs a handler of SIGCHLD, which stays; a process that ignored SIGCHLD before still leaves no
  * zombies. The process is aborted when it has no descriptors left for the pipe that the handler writes to.
  * Returns the status; 255 when szProgram could not be executed; else -1 with
@@ -58,11 +60,11 @@ TAVO_API pid_t TLIBBackgroundExec(const char *szProgram, ...);
 TAVO_API int TLIBTimedExec(int cSeconds, const char *szProgram, ...);
 
 /*
- * Pid files: the first line holds a process id in decimal. A number outside 1 to the kernel's largest process id, or
- * with anything but blanks around it, is no number. Root opens no symbolic link as a pid file, and for root a file that
- * belongs neither to root nor to the user whose process it names holds no number either: both may have been put there to
- * have root signal a process of somebody's choice. For the same reason a file that its group or others may write to
- * holds no number.
+ * Pid files: the first line holds a process id in decimal, from 1 to the kernel's largest process id, with only blanks
+ * around it; otherwise the file counts as holding no number. Another user could plant a pid file to make root signal a
+ * process of that user's choice. So root does not open a symbolic link as a pid file, and for root these files hold no
+ * number: a file that belongs neither to root nor to the user whose process it names, and a file that its group or
+ * others may write to.
  */
 
 /* Returns the process id in the pid file szPath; 0 when it holds no number; -1 with
@@ -70,13 +72,13 @@ TAVO_API int TLIBTimedExec(int cSeconds, const char *szProgram, ...);
  *   ERR_OPEN_FAILED     the file cannot be opened, is not a regular file, or is a symbolic link and the caller root */
 TAVO_API pid_t TLIBReadPidFile(const char *szPath);
 
-/* Writes the caller's process id and a newline to szPath, creating the file (mode 0644, whatever the umask). Of an
- * existing file, the permission of group and others to write is taken away.
- * In a directory that everybody may write to, an existing file must belong to root or to the caller, be regular and have
- * no second name.
+/* Writes the caller's process id and a newline to szPath, creating the file (mode 0644, whatever the umask). An
+ * existing file loses the write permission of group and others.
+ * In a directory that everybody may write to, an existing file must belong to root or to the caller, be regular and
+ * have no second name.
  * Returns 0, or -1 with
  *   ERR_BAD_PARAMETERS  szPath is NULL
- *   ERR_OPEN_FAILED     the file cannot be created or opened, is not a regular file or is not to be trusted
+ *   ERR_OPEN_FAILED     the file cannot be created or opened, is not a regular file or fails this check
  *   ERR_WRITE_FAILED    the text could not be written */
 TAVO_API int TAVOProcPidFileCreate(const char *szPath);
 
@@ -90,15 +92,15 @@ TAVO_API int TLIBProcSignalByPidFile(const char *szPath, int signal);
 /* Returns 1 when TLIBProcSignalByPidFile(szPath, 0) succeeds, else 0 with its code. */
 TAVO_API int TLIBProcAliveByPidFile(const char *szPath);
 
-/* Returns 1 when there is a process pid, whoever owns it, else 0; 0 also for a pid below 1. Sets no code. */
+/* Returns 1 when there is a process pid, of any owner, else 0; 0 also for a pid below 1. Sets no code. */
 TAVO_API int BlTLIBProcAlive(pid_t pid);
 
-/* Finds the processes whose line in the process table matches szPattern, and stores the pids of the first nPid of them in
- * rgPid (not touched when nPid is 0 or less). The caller's own process counts when it matches; the search does not.
+/* Finds the processes whose line in the process table matches szPattern, and stores the pids of the first nPid of them
+ * in rgPid (not touched when nPid is 0 or less). The caller's own process counts when it matches; the search does not.
  * The source is /bin/ps -I, searched by grep, so szPattern is a basic regular expression there. Where ps does not know
  * -I, the process table is read from /proc ("PID ARGUMENTS", or "PID [NAME]" for a process without arguments) and
- * szPattern is plain text. The scratch file /tmp/tempTLIBPs followed by the caller's pid is removed afterwards; when
- * somebody else has taken that name, six random characters follow a dot.
+ * szPattern is plain text. The scratch file /tmp/tempTLIBPs followed by the caller's pid is removed afterwards; if
+ * another user has taken that name, a dot and six random characters follow it.
  * Returns how many processes match, which may exceed nPid, or -1 with
  *   ERR_BAD_PARAMETERS  szPattern is NULL or longer than 1024 bytes, or rgPid is NULL with nPid above 0
  *   ERR_READ_FAILED     the scratch file cannot be created or opened again
@@ -107,11 +109,11 @@ TAVO_API int BlTLIBProcAlive(pid_t pid);
  * Runs: /bin/ps, /bin/grep */
 TAVO_API int TLIBPs(const char *szPattern, pid_t *rgPid, int nPid);
 
-/* Removes a file; of a symbolic link, the link. Directories are refused.
+/* Removes a file, or a symbolic link itself. Directories are refused.
  * Returns 0, or -1 with
  *   ERR_BAD_PARAMETERS  szPath is NULL
  *   ERR_FILE_NOT_FOUND  there is no such file
- *   ERR_ACCESS_DENIED   not allowed, or the file system is read-only
+ *   ERR_ACCESS_DENIED   permission is missing, or the file system is read-only
  *   ERR_SYS_UNKNOWN     anything else */
 TAVO_API int TLIBSysRemove(const char *szPath);
 

@@ -128,7 +128,7 @@ constexpr ErrorCode codes[] = {
     ROW(ERR_MAKE_PATH,               "making a directory with its parents failed, or a share folder is not empty", ""),
     ROW(ERR_DB_INTERRUPTED,          "a store operation was interrupted", "try again"),
     ROW(ERR_RESERVED_A9,             "reserved", ""),
-    ROW(ERR_DB_OPEN,                 "a file is no account store", ""),
+    ROW(ERR_DB_OPEN,                 "a file is not an account store", ""),
     ROW(ERR_DB_CURSOR,               "reading or walking an account store failed", ""),
     ROW(ERR_DB_STORE,                "storing into an account store failed", "check the free space"),
     ROW(ERR_DB_DELETE,               "deleting from an account store failed", ""),
