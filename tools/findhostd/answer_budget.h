@@ -29,9 +29,9 @@ class Window {
     size_t next_ = 0;
 };
 
-// Anybody on the network may ask as often as he likes, and under any address. So an address gets two answers a second,
-// and the larger part of all answers is for those who got none in the last ten seconds: who floods from one address, or
-// from all of a small network, leaves room for the others.
+// Any host on the network may ask at any rate and from any address. So an address gets two answers a second, and most
+// answers are reserved for addresses that got none in the last ten seconds. A flood from one address, or from all of a
+// small network, leaves room for the others.
 class AnswerBudget {
   public:
     static constexpr size_t kAnswersASecond = 50;
@@ -39,7 +39,7 @@ class AnswerBudget {
     static constexpr size_t kToRecentAskers = 15;  // of the 50
     static constexpr int64_t kRecent = 10000;      // milliseconds
 
-    // Whether the asker is answered now, a monotonic time in milliseconds above 0; then it is noted.
+    // Returns whether the asker is answered at `now`, a monotonic time in milliseconds above 0, and counts the answer.
     bool Take(in_addr asker, int64_t now) noexcept;
 
   private:
@@ -48,7 +48,7 @@ class AnswerBudget {
         Window<kToOneAddress> answers;
     };
 
-    // All that are answered within ten seconds fit, so an entry that gives way is not a recent one.
+    // All sources of ten seconds fit, so an entry that is replaced is not a recent one.
     std::array<Source, kAnswersASecond *(kRecent / 1000) + 12> sources_{};
     Window<kAnswersASecond> all_;
     Window<kToRecentAskers> recent_;

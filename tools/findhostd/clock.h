@@ -7,7 +7,7 @@
 
 namespace findhostd {
 
-// Milliseconds that nobody can set; above 0.
+// The monotonic time in milliseconds, which a change of the clock does not affect; above 0.
 inline int64_t Now() noexcept
 {
     timespec now{};

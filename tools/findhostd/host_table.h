@@ -13,19 +13,19 @@ namespace findhostd {
 class HostTable {
   public:
     static constexpr size_t kMost = 1024;          // all addresses of four usual networks
-    static constexpr int64_t kKept = 15000;        // after its last answer a host is listed for so long
-    static constexpr int64_t kCollection = 10000;  // a caller waits for so long, and what it is told stays
+    static constexpr int64_t kKept = 15000;        // how long a host is listed after its last answer
+    static constexpr int64_t kCollection = 10000;  // how long a caller waits; entries do not change meanwhile
 
     // A query of ours. A new collection begins when the last one is over.
     void NoteQuery(int64_t now) noexcept;
 
-    // Within one collection the first answer from an address counts. True when the list has changed: the address is new
-    // to it, or says something else than in the collection before. A full table takes nobody in.
+    // Within one collection the first answer from an address counts. Returns true when the list has changed: the
+    // address is new to it, or its answer differs from the collection before. A full table takes no further hosts.
     bool Put(const Host &host, unsigned interface, int64_t now) noexcept;
 
     size_t Size() const noexcept { return count_; }
 
-    // A line a host, in the order in which they came: "MODEL,PROTOCOL,NAME,ADDRESS,INTERFACE". Drops who has gone.
+    // One line per host, in the order of arrival: "MODEL,PROTOCOL,NAME,ADDRESS,INTERFACE". Drops outdated hosts.
     std::string Text(int64_t now);
 
   private:

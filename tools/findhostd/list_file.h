@@ -6,7 +6,7 @@
 
 namespace findhostd {
 
-// Puts a new list in the place of the old one, whatever stands there: anybody may write to the folder. False with errno.
+// Replaces the list, and any foreign file at its path: everybody may write to the folder. Returns false with errno.
 bool WriteList(std::string_view text);
 
 }  // namespace findhostd

@@ -140,7 +140,7 @@ int Serve(int verdict)
     }
     if (network < 0)
         return Complain("cannot listen on UDP port 9999");
-    // Nobody listens, so it is not a daemon that has the lock, but somebody who may read the file.
+    // No process listens, so the lock is not held by a daemon but by a program that may read the file.
     if (locked && (::unlink(kPidFile) != 0 || (pid_file = OpenPidFile()) < 0))
         return Complain(kPidFile);
 
@@ -174,7 +174,7 @@ int Serve(int verdict)
     if (verdict >= 0) {
         LeaveStandardStreams(OpenNull());
         if (::write(verdict, &done, 1) != 1)
-            ::syslog(LOG_WARNING, "nobody waits for the daemon");
+            ::syslog(LOG_WARNING, "the starting program no longer waits for the daemon");
         ::close(verdict);
     }
     const bool ended = findhostd::KeepList(reports[0], ::signalfd(-1, &asked, SFD_CLOEXEC | SFD_NONBLOCK));

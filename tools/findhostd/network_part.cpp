@@ -83,7 +83,7 @@ void Send(int network, std::span<const uint8_t> bytes, in_addr to, unsigned inte
     ::sendmsg(network, &message, MSG_DONTWAIT | MSG_NOSIGNAL);
 }
 
-// The name as it is now. One that a list cannot hold is no name.
+// Reads the present host name; a name that a list cannot hold counts as empty.
 void PutOwnName(Host &host)
 {
     char name[256] = "";
@@ -108,7 +108,7 @@ class Listener {
                 Answer(packet);
             break;
         case PacketKind::reply:
-            // Each speaks for itself alone: nobody can put another's address into the list, or one from elsewhere.
+            // A host can announce only its own address, so it cannot list another host or one outside the network.
             if (host.address.s_addr != packet.from.s_addr || asked_ == 0 || Now() - asked_ > kCollect)
                 break;
             addresses_.Refresh();

@@ -9,7 +9,7 @@ namespace findhostd {
 // The socket that hears queries and answers; -1 with errno.
 int OpenNetworkSocket();
 
-// Gives up the rights of root and the file system for good, and limits what this process can take. False with errno.
+// Drops root's rights and the file system for good, and limits the resources of this process. Returns false with errno.
 bool DropPrivileges();
 
 // Answers queries and reports what it hears, until the other part is gone.

@@ -22,7 +22,7 @@ struct Host {
     uint32_t model;
     uint32_t protocol;
     in_addr address;
-    char name[kLongestName + 1];  // ends in a NUL; the bytes behind it are 0
+    char name[kLongestName + 1];  // ends in a NUL; the bytes after it are 0
 };
 
 // A name that a line of the list can hold, and that a terminal can show: 1 to 63 bytes of UTF-8 without control

@@ -1,4 +1,4 @@
-// Gives up what the network part of the daemon must not have.
+// Drops the rights that the network part of the daemon must not have.
 #include "network_part.h"
 
 #include <cstdlib>

@@ -37,7 +37,7 @@ class Name:
     returns: str             # the type; of a datum its own
     parameters: list         # names, in order; "..." for a variable list
     comment: Comment
-    section: Comment         # what stands above a whole part of the header
+    section: Comment         # the comment above a whole part of the header
     line: int
     group: list = dataclasses.field(default_factory=list)  # the names that one comment describes
     family: "Family" = None

@@ -42,8 +42,8 @@ class BlockTarget {
     // What was written through the descriptor is on the disk when it returns.
     void Sync();
 
-    // Lets the kernel read the table again. While partitions of the disk are in use it refuses that; then it is told of
-    // partition `changed` alone (0: of none). An image file has no partitions.
+    // Makes the kernel read the table again. It refuses that while partitions of the disk are in use; then it is
+    // notified only of partition `changed` (0: of none). An image file has no partitions.
     void RereadTable(int changed, const TableEntry &entry);
 
   private:

@@ -6,7 +6,7 @@
 
 namespace sfdisk {
 
-// Gives the exit status. Throws Failure.
+// Returns the exit status. Throws Failure.
 int RunList(const Options &options);
 int RunCreate(const Options &options);
 int RunClear(const Options &options);

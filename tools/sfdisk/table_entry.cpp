@@ -19,7 +19,7 @@ void Store32(uint8_t *at, uint64_t value)
         at[i] = static_cast<uint8_t>(value >> 8 * i);
 }
 
-// Cylinder, head and sector of the geometry that every BIOS assumes; its last address for what lies beyond 8 GB.
+// Cylinder, head and sector in the geometry that every BIOS assumes; its last address for sectors beyond 8 GB.
 void StoreCylinder(uint8_t *at, uint64_t sector)
 {
     constexpr uint64_t heads = 255;

@@ -138,7 +138,7 @@ TEST_F(TavoctlAccounts, UsersAreAddedChangedAndRenamed)
     EXPECT_EQ(Fields(groups, "staff").at(3), "bert,Anna");
     EXPECT_TRUE(PasswordIs("Anna", "secret one"));
 
-    EXPECT_EQ(Tavoctl({"user", "delete", "anna", "bert"}).status, 2);  // nobody can be asked
+    EXPECT_EQ(Tavoctl({"user", "delete", "anna", "bert"}).status, 2);  // there is no terminal to ask at
     ExpectDone({"user", "delete", "--yes", "anna", "bert"});
     EXPECT_EQ(Line(passwd, "Anna") + Line(shadow, "Anna") + Line(misc, "bert") + Line(samba, "bert"), "");
     EXPECT_EQ(Line(groups, "staff"), "staff:x:" + Fields(groups, "staff").at(2) + ":");
@@ -236,7 +236,7 @@ TEST_F(TavoctlAccounts, WhatIsRefusedChangesNothing)
         {{"group", "add", "staff", "--members", "anna,nemo"}, 3, "nemo"},
         {{"group", "add", "staff", "--description", "a:b"}, 2, "ERR_BAD_PARAMETERS"},
         {{"group", "add", "staff", "--gid", "100"}, 2, "users"},
-        {{"group", "modify", "administrators", "--leave", "anna"}, 3, "no member"},
+        {{"group", "modify", "administrators", "--leave", "anna"}, 3, "it is not a member"},
         {{"group", "rename", "nemo", "nobodies"}, 3, "ERR_NO_SUCH_GROUP"},
         {{"quota", "set", "anna", "7", "1M"}, 3, "not mounted"},
         {{"quota", "get", "anna", "7"}, 3, "not mounted"},
@@ -337,7 +337,7 @@ TEST_F(TavoctlAccounts, NamesThatMislead)
     WriteFile(misc, "#$_@UID__INDEX@_$3072$\n" + ReadFile(misc).substr(ReadFile(misc).find('\n') + 1));
     const test::Ran ran = Tavoctl({"user", "add", "--unknown-password", "carla"});
     EXPECT_EQ(ran.status, 0) << ran;
-    EXPECT_THAT(ran.err, HasSubstr("the user id " + Fields(passwd, "carla").at(2) + " was somebody's before"));
+    EXPECT_THAT(ran.err, HasSubstr("the user id " + Fields(passwd, "carla").at(2) + " belonged to a deleted user"));
     EXPECT_FALSE(PasswordIs("carla", ""));
 }
 
@@ -589,7 +589,7 @@ TEST_F(TavoctlAccounts, CheckNamesEveryDifferenceAndRepairsNone)
         {"user", "echo garbage >/tmp/.db.user.misc.1379", nullptr, misc, "the store is damaged"},
         {"user", "rm /tmp/.db.user.uid.1379; mkfifo /tmp/.db.user.uid.1379", nullptr, "/tmp/.db.user.uid.1379",
          "the store is damaged"},
-        {"group", "sed -i 's,^staff:.*,&;x,' /etc/group", "staff", groups, "the member anna;x is no user"},
+        {"group", "sed -i 's,^staff:.*,&;x,' /etc/group", "staff", groups, "the member anna;x is not a user"},
         {"group", "sed -i 's,^staff:.*,&;x,' /etc/group", "staff", groups, "file and store differ in members"},
         {"group", "echo nobody:here >>/etc/group_desc", "nobody", "/etc/group_desc", "it is in the file only"},
     };

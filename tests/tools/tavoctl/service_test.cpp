@@ -93,7 +93,7 @@ TEST_F(TavoctlService, ListShowsWhatIsEnabledAndWhatRuns)
     EXPECT_EQ(Row("media").at("enabled"), true);
     EXPECT_EQ(Row("media").at("running"), false);
     EXPECT_EQ(Row("media").at("since"), nullptr);
-    EXPECT_EQ(Row("DB").at("running"), nullptr) << "it is no process";
+    EXPECT_EQ(Row("DB").at("running"), nullptr) << "it is not a process";
     EXPECT_EQ(Row("crond").at("enabled"), nullptr) << "it has no key";
 
     EXPECT_EQ(Row("media", {"--volume", "/volume2"}).at("name"), "media");
@@ -196,7 +196,7 @@ TEST_F(TavoctlService, ReloadSignalsOrSaysWhyNot)
     EXPECT_EQ(Tavoctl({"service", "reload", "crond"}).status, 3) << "it does not run";
     const test::Ran photo = Tavoctl({"service", "reload", "photo"});
     EXPECT_EQ(photo.status, 1);
-    EXPECT_THAT(photo.err, HasSubstr("it has no daemon that could be told"));
+    EXPECT_THAT(photo.err, HasSubstr("it has no daemon that could reload"));
     Tavoctl({"service", "disable", "samba"});
 }
 

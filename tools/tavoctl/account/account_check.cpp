@@ -194,7 +194,7 @@ void AccountCheck::CheckIds()
             Add("", files_[0].path, "the id " + std::to_string(id) + " is shared: " + Joined(names, ", "));
     for (const auto &[id, key] : *ids)
         if (!lines_[0].contains(key))
-            Add("", id_store_, "the id " + id + " leads to " + key + ", which is no account");
+            Add("", id_store_, "the id " + id + " leads to " + key + ", which is not an account");
 }
 
 const std::vector<Finding> &AccountCheck::Run()

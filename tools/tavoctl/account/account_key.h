@@ -6,7 +6,7 @@
 
 namespace tavoctl {
 
-// What the name is stored under: in upper case. A name that has none stands for itself.
+// The key under which a name is stored: the name in upper case, or unchanged when it cannot be converted.
 std::string AccountKey(const std::string &name);
 
 }  // namespace tavoctl

@@ -25,7 +25,7 @@ void CheckColumn(const std::string &column, const std::vector<std::string> &colu
         Refuse("there is no field \"" + column + "\"");
 }
 
-// One record of comma-separated values; the text behind it is left. A quoted value may hold line ends.
+// Removes one record of comma-separated values from the beginning of the text. A quoted value may hold line ends.
 std::vector<std::string> TakeRecord(std::string_view &text, int &line)
 {
     std::vector<std::string> values(1);

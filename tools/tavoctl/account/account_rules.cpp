@@ -43,7 +43,7 @@ int LastUserId()
 void WarnOfReusedId(const std::string &name, int uid, int last_before)
 {
     if (uid <= last_before)
-        Warn("the user id " + std::to_string(Id(uid)) + " was somebody's before: files that he left now belong to " +
+        Warn("the user id " + std::to_string(Id(uid)) + " belonged to a deleted user: files of that user now belong to " +
              name);
 }
 

@@ -25,8 +25,8 @@ void RefuseTakenId(const std::string &name, int uid);
 // Throws a Failure when the model allows fewer than so many further accounts.
 void RefuseTooMany(int additions, const std::string &attempted);
 
-// Deletes accounts or groups by the library's function for that, in one batch. Throws a Failure when it fails, or when one
-// of them is there afterwards all the same.
+// Deletes accounts or groups by the library's function for that, in one batch. Throws a Failure when it fails, or when
+// one of them still exists afterwards.
 void DeleteAll(const std::vector<std::string> &names, int (*remove)(const char *const *, int),
                bool (*is_there)(const std::string &), const std::string &attempted);
 

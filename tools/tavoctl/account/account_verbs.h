@@ -28,7 +28,7 @@ Action AccountList(Arguments &in)
     };
 }
 
-// Gives it another name; what else changes with it is the library's.
+// Renames the account or group; the library changes whatever depends on the name.
 template <class Kind>
 Action AccountRename(Arguments &in)
 {
@@ -39,7 +39,7 @@ Action AccountRename(Arguments &in)
         const std::string attempted = std::string("rename the ") + Kind::noun + " " + *name + " to " + *new_name;
         const auto before = Kind::Read(*name);
         if (Kind::IsSystem(before) && !*system && Kind::guards_names)
-            throw UsageFailure(attempted, "the system needs it", "say --system to do it");
+            throw UsageFailure(attempted, "the system needs it", "--system does it anyway");
         auto after = before;
         after.name = *new_name;
         call.Change(std::string(Kind::noun) + " " + before.name, "name", before.name, after.name);
@@ -62,7 +62,7 @@ Action AccountDelete(Arguments &in)
             const auto record = Kind::Read(name);
             const std::string attempted = std::string("delete the ") + Kind::noun + " " + name;
             if (Kind::IsSystem(record) && !*system)
-                throw UsageFailure(attempted, "the system needs it", "say --system to do it");
+                throw UsageFailure(attempted, "the system needs it", "--system does it anyway");
             Kind::RefuseDelete(record, attempted);
             if (!*force)
                 Kind::RefuseUsed(record, attempted);
@@ -100,7 +100,7 @@ class ImportedRows {
             throw UsageFailure(Attempted(row), "duplicate name");
         const auto old = Kind::Find(name);
         if (old && !update_)
-            throw Failure{.attempted = Attempted(row), .hint = "say --update to change it", .code = Kind::exists_code};
+            throw Failure{.attempted = Attempted(row), .hint = "--update changes it", .code = Kind::exists_code};
         return old;
     }
 

@@ -55,7 +55,7 @@ struct GroupKind {
     static void RefuseUsed(const Group &group, const std::string &attempted)
     {
         if (const std::string users = UsersWithPrimaryGroup(Id(group.gid)); !users.empty())
-            throw UsageFailure(attempted, "it is the primary group of " + users, "say --force to do it");
+            throw UsageFailure(attempted, "it is the primary group of " + users, "--force does it anyway");
     }
     static void RefuseId(const std::string &name, int gid) { RefuseTakenGroupId(name, gid); }
     static void Set(const std::string &old_name, const Group &group, const std::string &attempted)
@@ -137,7 +137,7 @@ Action GroupModify(Arguments &in)
                 group.members.push_back(user);
         for (const std::string &user : SplitNames(leave->value_or("")))
             if (std::erase_if(group.members, [&](const std::string &member) { return SameName(member, user); }) == 0)
-                throw NotFound("take " + user + " out of the group " + *name, ERR_NO_SUCH_USER, "it is no member");
+                throw NotFound("take " + user + " out of the group " + *name, ERR_NO_SUCH_USER, "it is not a member");
         group.description = description->value_or(group.description);
         if (*gid) {
             RefuseTakenGroupId(group.name, static_cast<int>(**gid));
@@ -189,7 +189,7 @@ Action GroupCheck(Arguments &)
             const std::vector<std::string> fields = SplitFields(line);
             for (const std::string &member : SplitNames(fields[3]))
                 if (!users.contains(AccountKey(member)))
-                    check.Add(fields[0], "/etc/group", "the member " + member + " is no user");
+                    check.Add(fields[0], "/etc/group", "the member " + member + " is not a user");
         }
         check.Print(call);
     };
@@ -272,7 +272,7 @@ tavoctl group modify staff --join carla --leave anna,berta
 tavoctl group modify staff --members anna
 tavoctl group modify staff --description "")",
               GroupModify);
-    group.Add("rename", changes, Answer::Change(), R"(Gives a group another name, also in the lists of shared folders
+    group.Add("rename", changes, Answer::Change(), R"(Renames a group, also in the lists of shared folders
 and of Samba.
 
 tavoctl group rename staff team)",

@@ -19,7 +19,7 @@ struct Group {
     std::string description;
 };
 
-std::optional<Group> FindGroup(const std::string &name);  // throws a Failure when that cannot be told
+std::optional<Group> FindGroup(const std::string &name);  // throws a Failure when the look-up fails
 Group ReadGroup(const std::string &name);                 // throws a Failure, also when there is none
 
 // The names that the library lists, in its order; for completion too.

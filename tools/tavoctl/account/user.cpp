@@ -32,7 +32,7 @@ void UserKind::RefuseDelete(const User &user, const std::string &attempted)
 void UserKind::RefuseUsed(const User &user, const std::string &attempted)
 {
     if (const std::string use = UseOfUser(user.name, Id(user.uid)); !use.empty())
-        throw BusyFailure(attempted, "the user is " + use, "say --force to do it");
+        throw BusyFailure(attempted, "the user is " + use, "--force does it anyway");
 }
 
 namespace {
@@ -107,7 +107,7 @@ changed by rename, its password by passwd.
 tavoctl user modify anna --mail anna@example.com
 tavoctl user modify anna --description "" --privilege 0x23)",
              UserModify);
-    user.Add("rename", changes, Answer::Change(), R"(Gives an account another name, also one that differs in case only.
+    user.Add("rename", changes, Answer::Change(), R"(Renames an account; the new name may differ in case only.
 Id, password, groups, shared folders and home folder go with it.
 
 tavoctl user rename anna anna.berg)",

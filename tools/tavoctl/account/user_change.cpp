@@ -113,7 +113,7 @@ Action UserPasswd(Arguments &in)
     const PasswordChoice choice(in);
     return [=](Call &call) {
         const std::string attempted = "set the password of " + *name;
-        User user = ReadUser(*name);  // nobody is asked for a password in vain
+        User user = ReadUser(*name);  // checked before the password is asked for
         call.Change("user " + user.name, "password", PasswordState(user.password), "new");
         if (!call.Proceed())
             return;

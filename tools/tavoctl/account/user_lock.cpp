@@ -28,7 +28,7 @@ Action SetLock(Arguments &in, bool locked)
         for (const std::string &name : *names) {
             const User user = ReadUser(name);
             if (IsSystemUser(user) && !*system)
-                throw UsageFailure(attempted(name), "the system needs it", "say --system to do it");
+                throw UsageFailure(attempted(name), "the system needs it", "--system does it anyway");
             const std::string samba = SambaState(user.name);
             call.Change("user " + user.name, "password", PasswordState(user.password),
                         StateAfter(user, locked, attempted(name)));

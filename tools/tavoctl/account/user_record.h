@@ -32,7 +32,7 @@ struct User {
     TAVOUSER Record() const;
 };
 
-std::optional<User> FindUser(const std::string &name);  // throws a Failure when that cannot be told
+std::optional<User> FindUser(const std::string &name);  // throws a Failure when the look-up fails
 User ReadUser(const std::string &name);                 // throws a Failure, also when there is none
 std::optional<User> FindUserById(int uid);
 

@@ -90,7 +90,7 @@ bool ChoosePassword(const AccountRow &row, const PasswordChoice *choice, const s
     } else if (!hashed && !change.old_name && choice->IsMade())
         change.user.password = choice->For(change.user.name);
     else if (!hashed && !change.old_name)
-        throw UsageFailure(attempted, "it has no password", "say --unknown-password or --empty-password");
+        throw UsageFailure(attempted, "it has no password", "use --unknown-password or --empty-password");
     if (hashed && (differs || !change.old_name))
         plan.hashes.push_back(given);
     return differs || !password.empty() || !change.old_name;

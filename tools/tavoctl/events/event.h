@@ -1,4 +1,4 @@
-// What happens to the appliance, told by the kernel when it happens. No disk is read for it.
+// Events of the appliance, as the kernel reports them. No disk is read for them.
 #ifndef TAVOCTL_EVENT_H
 #define TAVOCTL_EVENT_H
 

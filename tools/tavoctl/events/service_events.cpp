@@ -17,7 +17,7 @@
 namespace tavoctl {
 namespace {
 
-// Tells by poll when a process ends.
+// Reports the end of a process to poll.
 class ProcessEnd {
   public:
     explicit ProcessEnd(pid_t pid) : fd_(static_cast<int>(::syscall(SYS_pidfd_open, pid, 0))) {}

@@ -66,8 +66,8 @@ void Call::Confirm(const std::string &question) const
     if (yes || dry_run)
         return;
     if (!::isatty(STDIN_FILENO) || !::isatty(STDERR_FILENO))
-        throw UsageFailure("go on without an answer to \"" + question + "\"", "nobody can be asked",
-                           "say --yes to do it");
+        throw UsageFailure("go on without an answer to \"" + question + "\"", "there is no terminal to ask at",
+                           "--yes does it without asking");
     std::cerr << Printable(question) << " [y/N] " << std::flush;
     std::string answer;
     std::getline(std::cin, answer);

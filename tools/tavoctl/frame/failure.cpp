@@ -55,7 +55,7 @@ int StatusOf(int code)
     }
 }
 
-// What the library needs at a time. Without descriptors no lock can be had, even if nobody holds it.
+// Checks for as many descriptors as the library needs at a time. Without them even a free lock cannot be taken.
 bool HasDescriptors()
 {
     constexpr std::size_t needed = 16;

@@ -1,4 +1,4 @@
-// What lies in a folder of the kernel's or of the devices'.
+// The names in a folder of /sys, /proc or /dev.
 #include "frame/folder_names.h"
 
 #include "frame/failure.h"

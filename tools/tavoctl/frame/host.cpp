@@ -18,8 +18,8 @@ void RefuseForeignHost()
 {
     if (!IsAppliance())
         throw Failure{.attempted = "change this machine",
-                      .reason = std::string("it is no appliance: there is no ") + defaults_file,
-                      .hint = "say --force-host if you mean it"};
+                      .reason = std::string("it is not an appliance: there is no ") + defaults_file,
+                      .hint = "--force-host does it anyway"};
 }
 
 }  // namespace tavoctl

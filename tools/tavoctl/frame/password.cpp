@@ -17,11 +17,11 @@ namespace tavoctl {
 namespace {
 
 constexpr std::size_t longest = 1024;
-constexpr char password_hint[] = "type one, send it as the first line of standard input, or say --empty-password";
+constexpr char password_hint[] = "type one, send it as the first line of standard input, or use --empty-password";
 
 termios shown;
 
-// Whoever interrupts the question wants to see again what he types.
+// Restores the echo of the terminal when the question is interrupted.
 extern "C" void ShowAndDie(int signal)
 {
     ::tcsetattr(STDIN_FILENO, TCSAFLUSH, &shown);
@@ -62,7 +62,7 @@ void Say(const std::string &text)
         throw Failure{.attempted = "ask for the password", .reason = std::strerror(errno)};
 }
 
-// Byte by byte, so that what follows the line is left for whoever reads on.
+// Reads byte by byte, so that the text after the line stays unread.
 std::string ReadLine()
 {
     std::string line;
@@ -85,7 +85,7 @@ std::string ReadHidden(const std::string &prompt)
 {
     std::string line;
     {
-        const Hidden hidden;  // before he sees that he may type
+        const Hidden hidden;  // before the prompt invites typing
         Say(prompt);
         line = ReadLine();
     }
@@ -118,8 +118,8 @@ std::string UnknownPassword()
 }
 
 PasswordChoice::PasswordChoice(Arguments &in)
-    : empty_(in.Flag("--empty-password", "no password: anybody can log in")),
-      unknown_(in.Flag("--unknown-password", "one that nobody knows: nobody can log in until it is set"))
+    : empty_(in.Flag("--empty-password", "no password: everybody can log in")),
+      unknown_(in.Flag("--unknown-password", "a random one: no login is possible until a password is set"))
 {
 }
 

@@ -30,7 +30,7 @@ bool IsShell(const std::string &name)
     return name == "sh" || name == "bash" || name == "ash" || name == "dash" || name == "busybox";
 }
 
-// The word without its folder, and without the ":" that a daemon puts behind its name to say what it does.
+// The word without its folder, and without the ":" that a daemon appends to its name before a description.
 std::string PlainName(const std::string &word)
 {
     std::string name = word.substr(word.rfind('/') + 1);
@@ -109,7 +109,7 @@ pid_t ProcessOf(const std::string &name)
 
 std::string StartOf(pid_t pid)
 {
-    // The name, in parentheses, may hold anything; the start is the 20th field behind it, in clock ticks since the boot.
+    // The name, in parentheses, may hold anything; the start is the 20th field after it, in clock ticks since the boot.
     constexpr int start_field = 20;
     const std::string stat = ReadAll("/proc/" + std::to_string(pid) + "/stat");
     const std::size_t behind_name = stat.rfind(") ");

@@ -1,4 +1,4 @@
-// One line on standard error about work that takes its time; nothing when that is no terminal.
+// One line on standard error about long work; nothing when that is not a terminal.
 #ifndef TAVOCTL_PROGRESS_H
 #define TAVOCTL_PROGRESS_H
 

@@ -92,7 +92,7 @@ std::vector<Edit> ShortestScript(const Lines &before, const Lines &after)
 
 std::string Range(std::size_t start, std::size_t count)
 {
-    // A range without lines stands behind the line before it.
+    // A range without lines is numbered by the line before it.
     return std::to_string(count ? start + 1 : start) + (count == 1 ? "" : "," + std::to_string(count));
 }
 

@@ -129,14 +129,14 @@ struct Call {
                        after ? column.read(*after) : Cell());
     }
     void Change(const std::string &object, const std::string &column, const Cell &before, const Cell &after);
-    // An id or the like that was chosen; stands in the JSON beside "changed".
+    // Records a chosen value, such as an id; a field of the JSON beside "changed".
     void Tell(const std::string &name, const Cell &value) { report.chosen.emplace_back(name, value); }
 
     // Whether there is something to do: not with --dry-run, and not when nothing was going to change. Asks the question
     // as Confirm does.
     bool Proceed(const std::string &question = {}) const;
 
-    // Asks "QUESTION [y/N]" unless --yes was given; throws a Failure when the answer is no or nobody can be asked.
+    // Asks "QUESTION [y/N]" unless --yes was given; throws a Failure when the answer is no or there is no terminal.
     void Confirm(const std::string &question) const;
 
     void Print(const Table &table) const;

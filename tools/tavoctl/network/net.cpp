@@ -186,7 +186,7 @@ Action NetDns(Arguments &in)
     return [=](Call &call) {
         if (*none != addresses->empty())
             throw UsageFailure("set the name servers", *none ? "there are some, and --none" : "none was named",
-                               "name them in the order in which they are asked, or say --none");
+                               "name them in the order in which they are asked, or use --none");
         call.Change("network", "dns", PresentServers(), *addresses);
         if (call.Proceed())
             Must(TAVONetDNSSet(StringList(*addresses).Get()) == 0, "set the name servers",
@@ -282,7 +282,7 @@ tavoctl net show
 tavoctl net show eth0
 tavoctl net show --json)",
             NetShow);
-    net.Add("set", changes, Answer::Change(), R"(Gives an interface its address: one from DHCP, or a static one. If you
+    net.Add("set", changes, Answer::Change(), R"(Sets the address of an interface: one from DHCP, or a static one. If you
 reach the appliance by that very interface, say --try: unless the new settings are confirmed in time, here or with
 `tavoctl net confirm` from another connection, the old ones come back, also when this command has ended with its
 connection. A static address is taken only when no other host answers for it.
@@ -322,7 +322,7 @@ tavoctl net gateway 192.0.2.1)",
 tavoctl net dns 192.0.2.53 2001:db8::53
 tavoctl net dns --none)",
             NetDns);
-    net.Add("hostname", changes, Answer::Change(), R"(Gives the appliance another name: in the kernel, in the stored
+    net.Add("hostname", changes, Answer::Change(), R"(Renames the appliance: in the kernel, in the stored
 settings and in /etc/hosts. 1 to 15 letters, digits, "-" and "_".
 
 tavoctl net hostname attic)",
@@ -359,7 +359,7 @@ tavoctl net ipv6 eth0 2001:db8::10/64 --gateway 2001:db8::1
 tavoctl net ipv6 --remove eth0 2001:db8::10/64)",
             NetIpv6);
     net.Add("wol", changes, Answer::Change(),
-            R"(Lets an interface wake the appliance, or no more. On which packets is set
+            R"(Allows or forbids an interface to wake the appliance. On which packets is set
 by wol_enabled_options in /etc/tavoinfo.conf.
 
 tavoctl net wol eth0 on)",

@@ -182,7 +182,7 @@ void RefuseUsedAddresses(const std::vector<NetDifference> &differences)
 
 void MakeChange(const NetDocument &wanted)
 {
-    // Nobody else changes the network meanwhile. The guardian needs the lock to put it back.
+    // Other programs cannot change the network meanwhile. The guardian needs the lock to restore it.
     const HeldLocks lock(TAVO_LOCK_HOST, false, usual_wait);
     ApplyNet(wanted);
     Must(TAVONetHostsRefresh() >= 0, "bring /etc/hosts up to date");

@@ -40,7 +40,7 @@ void RefuseUsedAddress(const TAVONETCARD &card, const std::string &address)
     const int used = TAVONetAddressProbe(card.szInterface, address.c_str(), probe_milliseconds);
     Must(used >= 0, attempted, "--no-probe takes it without asking");
     if (used == 1)
-        throw BusyFailure(attempted, "another host uses it", "--no-probe takes it all the same");
+        throw BusyFailure(attempted, "another host uses it", "--no-probe takes it anyway");
 }
 
 }  // namespace tavoctl

@@ -144,7 +144,7 @@ Action NetBond(Arguments &in)
             throw UsageFailure(attempted, members->empty() ? "it has no members" : "a dissolved bond has no members");
         for (const std::string &member : *members)
             Must(TAVONetLinkAggrOptSlsaveAdd(&record, member.c_str()) == 0, "take " + member + " into " + name,
-                 HintFor{ERR_LINK_AGGR_TYPE, "it is no Ethernet card"});
+                 HintFor{ERR_LINK_AGGR_TYPE, "it is not an Ethernet card"});
         call.Change(name, "mode", {}, *mode);
         call.Change(name, "members", MembersOfBond(name), *members);
         if (call.Proceed("The network stops while " + name + " changes. Go on?"))

@@ -63,7 +63,7 @@ bool IsGone(int socket)
     return ::recv(socket, &word, 1, MSG_PEEK | MSG_DONTWAIT) == 0;
 }
 
-// Nothing of the terminal or the connection from which the command came; a name of its own, for whoever kills by name.
+// Detaches from the terminal or connection of the command, and sets a name, so that the process can be killed by name.
 int StandAlone()
 {
     ::setsid();
@@ -107,7 +107,7 @@ bool IsConfirmed(int command, int signals, int seconds)
         case give_up:
             return false;
         default:
-            // The command is gone. What it has made may be confirmed by somebody else, half of it by nobody.
+            // The command has died. A complete change can still be confirmed by another process, an incomplete one not.
             if (!is_made)
                 return false;
             ends[0].fd = -1;
@@ -115,7 +115,7 @@ bool IsConfirmed(int command, int signals, int seconds)
     }
 }
 
-// From here on nobody can confirm any more; true when somebody just has.
+// Ends the time for confirming; returns true when a confirmation has just arrived.
 bool IsTooLate(int pid_fd, int signals)
 {
     (void)!::ftruncate(pid_fd, 0);

@@ -14,8 +14,8 @@ namespace tavoctl {
 
 class NetChange {
   public:
-    // From here on the old settings come back. Throws a Failure where another change goes on. `seconds` is 0 when nobody
-    // has to confirm.
+    // From here on the old settings come back. Throws a Failure while another change is in progress. `seconds` is 0
+    // when no confirmation is needed.
     explicit NetChange(int seconds);
     ~NetChange();
     NetChange(const NetChange &) = delete;

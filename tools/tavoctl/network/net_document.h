@@ -21,7 +21,7 @@ struct NetItem {
     const char *feature;  // what the start script must keep; "" for what every one keeps
     const char *pattern;  // of the text, or of each of the texts, for the schema; "" for any
     const char *about;
-    // Gives the text its one form; empty when it is not valid.
+    // Returns the canonical form of the text; nullopt when it is not valid.
     std::optional<std::string> (*normal)(const std::string &);
     long least = 0;
     long most = 0;

@@ -37,7 +37,7 @@ TAVONETCARD WantedCard(const std::string &wanted)
         mask = std::string(text).substr(std::string(text).find('/') + 1);
     }
     if (!BlTLIBIsIpMask(mask.data()))
-        refuse("that is no mask");
+        refuse("not a mask");
     card.nMode = TAVO_NET_STATIC;
     Put(card.szIp, address);
     Put(card.szMask, mask);

@@ -191,7 +191,7 @@ Action ServiceReload(Arguments &in)
             const uint32_t mask = ReloadMask(id);
             if (!mask)
                 throw Failure{.attempted = what,
-                              .reason = "it has no daemon that could be told",
+                              .reason = "it has no daemon that could reload",
                               .hint = "restart it instead",
                               .status = exit_failed};
             const int done = TAVONetService(mask, TAVO_DAEMON_RELOAD);

@@ -74,8 +74,8 @@ ServiceState StateOf(int id, bool may_wait)
     const char *key = TAVOServiceKeyGet(id);
     state.enabled = IsEnabled(key);
     AddFolders(state);
-    // What has no process of its own runs when the library says that all it needs is there; what has nothing at all,
-    // such as the stack of database servers, cannot be told.
+    // A service without a process of its own runs when the library reports that all it needs is there. For a service
+    // without any of this, such as the stack of database servers, the state is not known.
     if (const char *proc = TAVOServiceProcGet(id))
         AddProcess(state, proc);
     else if (may_wait && (key || state.bound))

@@ -199,8 +199,8 @@ void RefuseToWake(const std::string &disk, bool wake, const std::string &attempt
     if (power != Power::spinning)
         throw Failure{.attempted = attempted,
                       .reason =
-                          disk + (power == Power::standby ? " is in standby" : " does not tell whether it sleeps"),
-                      .hint = "say --wake to read it all the same",
+                          disk + (power == Power::standby ? " is in standby" : " does not report whether it sleeps"),
+                      .hint = "--wake reads it anyway",
                       .status = exit_failed};
 }
 

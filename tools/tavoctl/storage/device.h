@@ -59,7 +59,7 @@ struct Mount {
 // /proc/mounts.
 std::vector<Mount> Mounts();
 
-// Why a device must not be overwritten, such as "/dev/sda1 is mounted on /mnt"; empty when nobody uses it.
+// Returns why a device must not be overwritten, such as "/dev/sda1 is mounted on /mnt"; empty when it is unused.
 std::string UseOf(const std::string &device);
 
 // Throws a Failure when a device is in use, or is none.

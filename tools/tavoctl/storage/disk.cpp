@@ -169,7 +169,7 @@ Action DiskStandby(Arguments &in)
     const auto timer = in.Option("--timer", "MINUTES", minutes_kind, "set the spin-down timer of all disks instead");
     return [=](Call &call) {
         if (!words->empty() + *all + timer->has_value() != 1)
-            throw UsageFailure("spin down", "name disks, or say --all, or --timer");
+            throw UsageFailure("spin down", "name disks, or use --all, or --timer");
         if (*timer) {
             call.Change("all disks", "spin-down timer", {}, **timer);
             if (call.Proceed("Set the spin-down timer of all disks?"))

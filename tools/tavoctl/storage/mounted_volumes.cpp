@@ -15,7 +15,7 @@ namespace {
 
 constexpr std::string_view prefix = "/volume";
 
-// 0 for a path that is no volume's.
+// Returns 0 for a path that is not that of a volume.
 int VolumeNumber(std::string_view path)
 {
     int number = 0;
@@ -39,7 +39,7 @@ std::vector<MountedVolume> MountedVolumes()
     std::map<int, MountedVolume> found;
     while (const mntent *mount = ::getmntent(mounts.get()))
         if (const int number = VolumeNumber(mount->mnt_dir); number > 0)
-            found[number] = {number, mount->mnt_dir, mount->mnt_fsname};  // the last one lies on top
+            found[number] = {number, mount->mnt_dir, mount->mnt_fsname};  // the last mount covers the earlier ones
     std::vector<MountedVolume> volumes;
     for (auto &[number, volume] : found)
         volumes.push_back(std::move(volume));

@@ -183,7 +183,7 @@ Action RaidSuperblock(Arguments &in)
             if (!*wake && Sleeps(path))
                 throw Failure{.attempted = "read the superblock of " + path,
                               .reason = "its disk is in standby",
-                              .hint = "say --wake to read it nevertheless"};
+                              .hint = "--wake reads it anyway"};
             paths.Push(path);
         }
         RAIDSBENTRY *entries = nullptr;

@@ -149,7 +149,7 @@ Action RaidTakeOut(Arguments &in)
             if (Contains(active, path))
                 throw BusyFailure(attempted, path + " is in sync");
             if (!Contains(all, path))
-                throw NotFound(attempted, ERR_PATH_NOT_FOUND, path + " is no member");
+                throw NotFound(attempted, ERR_PATH_NOT_FOUND, path + " is not a member");
             call.Change(name, "members", path, {});
         }
         if (!call.Proceed("Remove " + Joined(paths, ", ") + " from " + name + "?"))
@@ -198,7 +198,7 @@ Action RaidErase(Arguments &in)
     const auto uuid = in.Option("--uuid", "UUID", any_text, "of an array that does not run");
     return [=](Call &call) {
         if (words->empty() == !*uuid)
-            throw UsageFailure("erase superblocks", "name members, or say --uuid");
+            throw UsageFailure("erase superblocks", "name members, or use --uuid");
         if (*uuid) {
             const std::string attempted = "erase the superblocks of array " + **uuid;
             for (const Array &array : ReadArrays()) {

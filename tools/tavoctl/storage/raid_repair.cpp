@@ -117,9 +117,9 @@ void ForceStart(Call &call, const std::string &path, const StoppedArray &array)
     call.Tell("members", members);
     const bool lacks = array.UpToDate() < array.Needed();
     const std::string loss =
-        lacks ? "Members that are behind are taken as they are: what was written since may be lost or damaged."
-              : "What was being written when the power failed may be damaged, also in neighbouring blocks; what was "
-                "written before is whole.";
+        lacks ? "Outdated members are used as they are: data written since then may be lost or damaged."
+              : "Data that was being written when the power failed may be damaged, also in neighbouring blocks; "
+                "data written before is intact.";
     call.Tell("risk", loss);
     if (!call.json) {
         for (const std::string &line : members)
@@ -172,7 +172,7 @@ Action RaidStart(Arguments &in)
     const auto wake = in.Flag("--wake", "read the disks although that wakes them");
     return [=](Call &call) {
         if (*all + word->has_value() != 1 || (*all && *force))
-            throw UsageFailure("start arrays", "name an array, or say --all without --force");
+            throw UsageFailure("start arrays", "name an array, or use --all without --force");
         if (*all)
             return StartAll(call, *wake);
         const std::string path = ArrayPath(**word);

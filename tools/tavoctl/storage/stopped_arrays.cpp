@@ -12,7 +12,7 @@
 namespace tavoctl {
 namespace {
 
-// The kernel takes a member along whose count is one behind: it was being told when the power went.
+// The kernel accepts a member whose count is one lower: the power failed while the members were being updated.
 constexpr int tolerated = 1;
 
 std::string DiskOf(const std::string &member)

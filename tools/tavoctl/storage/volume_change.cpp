@@ -162,7 +162,7 @@ Action VolumeMount(Arguments &in)
     const auto all = in.Flag("--all", "every volume");
     return [=](Call &call) {
         if (*all + word->has_value() != 1)
-            throw UsageFailure("mount volumes", "name one, or say --all");
+            throw UsageFailure("mount volumes", "name one, or use --all");
         std::vector<Volume> volumes;
         if (*all)
             volumes = ReadVolumes(true);
@@ -226,7 +226,7 @@ Action VolumeGrow(Arguments &in)
         RefuseTooLarge(size, attempted);
         const auto system = ReadExtFileSystem(volume.device);
         call.Change(volume.mount, "size", Bytes{*volume.size}, Bytes{size});
-        // An attempt that was cut off may have left the file system behind the device.
+        // An interrupted attempt may have left the file system smaller than the device.
         constexpr uint64_t block = 4096;
         if (system && system->size + block <= *volume.size)
             call.Change(volume.mount, "file system", Bytes{system->size}, Bytes{size});
