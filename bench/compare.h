@@ -17,7 +17,7 @@ namespace bench {
 
 struct Contender {
     std::string name;                // "tavo", or the peer
-    std::function<uint64_t()> work;  // gives a number that depends on its result
+    std::function<uint64_t()> work;  // returns a number that depends on its result
 };
 
 // What a piece of work is measured by: the time that passes, or the time of this processor alone, which other load on

@@ -25,7 +25,7 @@ std::string Trimmed(std::string text)
     return text.c_str();
 }
 
-// The rule as it is told: the first token between equal signs, trimmed.
+// The documented rule: the first token between equal signs, trimmed.
 bool SetsByTokens(const std::string &line, const std::string &key)
 {
     if (key.empty() || line.starts_with('#') || line.starts_with(';') || line.find('=') == line.npos)

@@ -20,7 +20,7 @@ def declarations():
     for family in headers.in_order():
         source = (headers.TREE / "include" / family.header).read_text()
         code = family.code
-        # Where the compiler is told how to lay a record out, it is asked afterwards; everywhere else it is checked.
+        # cffi takes the layout of records with attributes from the compiler and checks that of all others.
         for struct in re.findall(r"typedef struct (?:__attribute__\S+ )?\w* ?\{.*?\} \w+;", source, re.S):
             if "__attribute__" in struct:
                 name = re.search(r"(\w+);$", struct).group(1)

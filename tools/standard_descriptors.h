@@ -5,9 +5,9 @@
 #include <fcntl.h>
 #include <unistd.h>
 
-// Opens /dev/null in place of each of the descriptors 0 to 2 that is closed: otherwise the first file that the program
-// opens, such as a disk, becomes its standard output, and messages are written into it. First thing in main. Returns
-// whether standard output was one of them: what is written there reaches nobody.
+// Opens /dev/null for each closed descriptor from 0 to 2: otherwise the first file that the program opens, such as a
+// disk, becomes its standard output, and messages are written into it. Call it first in main. Returns whether standard
+// output was closed, so that output is lost.
 inline bool FillStandardDescriptors() noexcept
 {
     bool no_output = false;

@@ -13,7 +13,7 @@ namespace {
 // Account names are keyed by this: a language of the process must not change where a name is found.
 constexpr const char *kNoLanguage = "";
 
-// ICU answers by code; what does not fit is told by the length.
+// ICU reports failures by code, but a result that does not fit only by its length.
 int32_t Length(UErrorCode error, int32_t length)
 {
     if (U_SUCCESS(error) || error == U_BUFFER_OVERFLOW_ERROR)

@@ -1,4 +1,4 @@
-// Tells whether the domain part of a store is stale.
+// Checks whether the domain part of a store is stale.
 #include "tavo_bdb.h"
 
 #include "account/detail/btree.h"

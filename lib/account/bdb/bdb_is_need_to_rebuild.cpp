@@ -1,4 +1,4 @@
-// Tells whether a text file has been changed since its store was written.
+// Checks whether a text file has changed since its store was written.
 #include "tavo_bdb.h"
 
 #include "account/detail/btree.h"

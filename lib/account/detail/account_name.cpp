@@ -69,7 +69,7 @@ std::optional<std::string> AccountKey(std::string_view name, size_t key_size)
     tavoerrno = 0;
     const int length = TLIBUnicodeUTF8StrUpper(key.c_str(), upper.data(), static_cast<int>(upper.size()));
     if (length <= 0 && tavoerrno == ERR_OUT_OF_MEMORY)
-        throw std::bad_alloc();  // as a name without a key an account would get a store's entry that nobody finds
+        throw std::bad_alloc();  // without a key the account's store entry could never be found
     if (length <= 0)
         return std::nullopt;
     upper.resize(static_cast<size_t>(length));

@@ -35,8 +35,8 @@ inline std::string WithNul(std::string_view text)
     return std::string(text).append(1, '\0');
 }
 
-// The upper-case name with its NUL, as the stores have it. Empty when the name is no UTF-8 or too long for the buffer
-// that the appliance's other programs give it.
+// The upper-case name with its NUL, as the stores have it. Empty when the name is not UTF-8 or too long for the buffer
+// that the appliance's other programs use.
 std::optional<std::string> AccountKey(std::string_view name, size_t key_size = kUserKeySize);
 
 }  // namespace tavo

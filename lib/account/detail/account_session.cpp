@@ -74,7 +74,7 @@ int AccountSession::OpenAll()
     return OpenSettled(all);
 }
 
-// While nobody who asks for the system's lock changes the text files.
+// Under the system's lock, so that programs that take it do not change the text files meanwhile.
 int AccountSession::OpenSettled(std::span<const size_t> stores)
 {
     if (!system_.Take(kLockSeconds))

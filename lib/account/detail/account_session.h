@@ -1,5 +1,5 @@
-// One locked use of the stores of an account family: take the locks, bring the stores up to date, open them, and, after a
-// change, seal them again. What goes wrong comes back as a code.
+// One locked use of the stores of an account family: take the locks, bring the stores up to date, open them, and, after
+// a change, seal them again. What goes wrong comes back as a code.
 #ifndef TAVO_ACCOUNT_DETAIL_ACCOUNT_SESSION_H
 #define TAVO_ACCOUNT_DETAIL_ACCOUNT_SESSION_H
 
@@ -24,9 +24,9 @@ class AccountSession {
     AccountSession(const AccountSession &) = delete;
     AccountSession &operator=(const AccountSession &) = delete;
 
-    // Opens the stores of the family that `stores` lists, under the family's lock, shared. When they must be built anew
-    // the lock is taken exclusively, and kept. A program that is not root reads the text files instead, without any lock.
-    // 0, ERR_LOCK_FAILED, ERR_OPEN_FAILED; what BuildStores says; what TextStores::Open says.
+    // Opens the stores of the family that `stores` lists, under the family's lock, shared. To rebuild them
+    // it takes the lock exclusively, and keeps it. A program that is not root reads the text files instead, without any
+    // lock. 0, ERR_LOCK_FAILED, ERR_OPEN_FAILED; what BuildStores says; what TextStores::Open says.
     int OpenToRead(std::span<const size_t> stores);
 
     // Takes `locks` and the system's lock exclusively and opens all stores. ERR_ACCESS_DENIED to all but root.
@@ -38,15 +38,16 @@ class AccountSession {
     StoreView *View(size_t index) const { return is_root_ ? Store(index) : text_stores_.View(index); }
     Btree *Store(size_t index) const { return stores_[index].get(); }
 
-    // To be called before the first change of a store: from here to Seal, a death means that they are built anew.
+    // Call it before the first change of a store: if the process dies between here and Seal, the stores are rebuilt.
     void BeginChange();
 
-    // The text files win over the stores for whatever this change has not touched: takes over what somebody has changed in
-    // them since the stores were opened. 0, ERR_READ_FAILED or a code of the stores.
+    // The text files win over the stores for whatever this change has not touched: takes over what somebody has changed
+    // in them since the stores were opened. 0, ERR_READ_FAILED or a code of the stores.
     int Merge();
-    bool IsMerged() const;  // nobody has changed a text file since
+    bool IsMerged() const;  // no text file has changed since
 
-    // What the end of a change leaves: files that were written from the stores, or, as nothing changed, those from before.
+    // What the end of a change leaves: files that were written from the stores, or, as nothing changed, those from
+    // before.
     enum class Texts { kWritten, kAsBefore };
 
     // Closes the stores and seals them: they and the text files agree. ERR_DB_CLOSE when a store could not be written;
@@ -56,7 +57,7 @@ class AccountSession {
     // The same with the times of the files that were written from the stores.
     int SealWritten();
 
-    // Gives the locks back; false when that failed. The destructor does the same.
+    // Releases the locks; returns false when that failed. The destructor does the same.
     bool Unlock();
 
   private:

@@ -116,7 +116,7 @@ void AccountTransaction::ComposeOne(unsigned target)
     }
     if (failure.code == 0)
         return;
-    // A service that is not there has nothing to be told.
+    // A service that is not installed needs no change.
     if (target != kGuestModule || failure.code != ERR_FILE_NOT_FOUND)
         for (NameStep &step : names)
             step.pending |= step.targets & target;
@@ -224,7 +224,7 @@ void AccountTransaction::TakeHomeSteps()
             elsewhere_.push_back(step);
         if (result == HomeResult::kFailed)
             LogFollowUp({.home = &step, .code = reason}, where_);
-        // Where there are no homes, or somebody's folder has the new name, trying again would help nobody.
+        // Without a folder for homes, or when the new name is taken, trying again would be useless.
         return result == HomeResult::kDone || (result == HomeResult::kFailed && (reason == ENOENT || reason == EEXIST));
     });
 }

@@ -1,5 +1,5 @@
-// One change of users or groups with everything that follows from it: the locks, the stores, the text files, the files of
-// neighbours, the home folders. What a change that died has left to do is done first.
+// One change of users or groups with everything that follows from it: the locks, the stores, the text files, the files
+// of neighbours, the home folders. What a change that died has left to do is done first.
 #ifndef TAVO_ACCOUNT_DETAIL_ACCOUNT_TRANSACTION_H
 #define TAVO_ACCOUNT_DETAIL_ACCOUNT_TRANSACTION_H
 
@@ -26,16 +26,17 @@ class AccountTransaction {
     AccountTransaction(const AccountTransaction &) = delete;
     AccountTransaction &operator=(const AccountTransaction &) = delete;
 
-    // Takes the locks, all three of the accounts when something is left to do, does it, and opens the stores. The codes of
-    // AccountSession::OpenToChange and ResumeCommit.
+    // Takes the locks, all three of the accounts when something is left to do, does it, and opens the stores. The codes
+    // of AccountSession::OpenToChange and ResumeCommit.
     int Begin(unsigned locks);
 
     AccountSession &Session() { return session_; }
 
-    // Whether rights of somebody who had this name are still to be taken away: a new account of the name would have them.
+    // Whether rights of somebody who had this name are still to be taken away: a new account of the name would have
+    // them.
     bool IsPending(bool is_group, const std::string &key) const;
 
-    // What the change is going to do. `targets` of a step: where the name stands.
+    // The planned steps of the change. `targets` of a step: the files that contain the name.
     AccountCommit &Files() { return commit_; }
     NetBackupUsers &Backup()
     {
@@ -46,14 +47,14 @@ class AccountTransaction {
     // Composes the neighbours' files for the steps in Files(). What cannot be composed is pending.
     void Compose();
 
-    // Composes the account files by `compose` from stores into which everything is merged that others have changed in the
-    // files meanwhile. Its code; after some rounds ERR_RENAME_FAILED.
+    // Composes the account files by `compose` from stores into which everything is merged that others have changed in
+    // the files meanwhile. Its code; after some rounds ERR_RENAME_FAILED.
     int ComposeAccounts(const std::function<int()> &compose);
 
     // Everything at once, then the home folders. A code of AccountCommit::Commit. From 0 on nothing fails any more.
     int Commit();
 
-    // Gives the locks back, then does what takes its time: folders are removed and copied. False when a lock could not be
+    // Releases the locks, then does the slow steps: removes and copies folders. Returns false when a lock could not be
     // released.
     bool End();
 

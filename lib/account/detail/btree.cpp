@@ -224,8 +224,8 @@ int Btree::CloseFile() noexcept
     return errno == ENOMEM ? ERR_OUT_OF_MEMORY : ERR_DB_CLOSE;
 }
 
-// A change through a handle of a caller's own, not by the account families (they break the seal first and make it anew
-// themselves), keeps the stores sealed.
+// A change through a caller's own handle keeps the stores sealed. (The account families remove and rewrite the seal
+// themselves.)
 bool Btree::NoteChange()
 {
     if (read_only_) {

@@ -1,5 +1,5 @@
-// One open store: a btree file of Berkeley DB behind a handle that callers know as TAVOBDB. What goes wrong comes back
-// as an error code; nothing here sets the error state or logs, and errno says what the system said.
+// One open store: a btree file of Berkeley DB. Callers know its handle as TAVOBDB. Failures are returned as error
+// codes, with the system's errno; nothing here sets the error state or logs.
 #ifndef TAVO_ACCOUNT_DETAIL_BTREE_H
 #define TAVO_ACCOUNT_DETAIL_BTREE_H
 
@@ -19,8 +19,8 @@ namespace tavo {
 
 class Btree : public TAVOBDB, public StoreView {
   public:
-    // `mode` is given to a file that is created, and to any file when we are root; 0 leaves an existing file's alone. The
-    // stores of the families have modes of their own, and what is not root's alone is not a store there.
+    // `mode` is given to a file that is created, and to any file when we are root; 0 leaves an existing file's alone.
+    // The stores of the families have modes of their own, and what is not root's alone is not a store there.
     struct Options {
         int flags = 0;
         bool info = true;
@@ -30,10 +30,10 @@ class Btree : public TAVOBDB, public StoreView {
     // 0 and a handle, or an error code. A file that is not a store is gone after ERR_DB_OPEN.
     static int Open(const char *path, const Options &options, std::unique_ptr<Btree> &out);
 
-    // A new store in a folder that nobody else can enter. The file's mode is 0600.
+    // Creates a new store in a private folder. The file's mode is 0600.
     static int Create(const char *path, std::unique_ptr<Btree> &out);
 
-    // The handle behind a caller's pointer: every TAVOBDB comes from Open.
+    // The store of a caller's handle: every TAVOBDB comes from Open.
     static Btree *Of(TAVOBDB *handle) { return static_cast<Btree *>(handle); }
     static const Btree *Of(const TAVOBDB *handle) { return static_cast<const Btree *>(handle); }
 
@@ -52,8 +52,8 @@ class Btree : public TAVOBDB, public StoreView {
     int GetNumber(std::string_view key, int32_t &value) const;
     int SetNumber(std::string_view key, int32_t value);
 
-    // Takes over what the text files say by now, except for the keys that were stored or deleted through this handle, and
-    // for domain accounts, which the text files do not have.
+    // Takes over what the text files say by now, except for the keys that were stored or deleted through this handle,
+    // and for domain accounts, which the text files do not have.
     int TakeOver(const std::map<std::string, std::string, std::less<>> &entries, StoreContents contents);
 
     int Flush();  // hands all pages to the file

@@ -74,7 +74,7 @@ class BuildDir {
     bool made_ = false;
 };
 
-// Nobody but root can have written to it, and nobody who may not can read it.
+// Returns true when only root can have written to the file, and its mode grants no more than it should.
 bool IsOurs(const struct stat &st, mode_t mode)
 {
     return st.st_uid == 0 && st.st_nlink == 1 && (st.st_mode & 07777 & ~mode) == 0;

@@ -22,7 +22,7 @@ bool IsPlain(char byte)
     return byte > ' ' && byte != '%' && byte != 0x7F;
 }
 
-// A name may hold blanks; an empty one is a field all the same.
+// A name may hold blanks; an empty one is still a field.
 std::string Encoded(std::string_view text)
 {
     if (text.empty())

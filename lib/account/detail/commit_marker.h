@@ -1,15 +1,15 @@
-// The commit marker of the accounts: what a change is going to do, written down before the first file is moved. It names the
-// new files, what becomes of names elsewhere on the appliance, and what becomes of home folders. Who finds it finishes the
-// change; every step can be done twice. One line a step, blanks between the fields:
+// The commit marker of the accounts: the steps of a change, written before the first file is moved. It names the new
+// files, the changes of names elsewhere on the appliance, and those of home folders. A process that finds it completes
+// the change; every step can be repeated. One line per step, blanks between the fields:
 //
 //     file account|TARGET TEMPORARY PATH IDENTITY-OF-THE-NEW IDENTITY-OF-THE-OLD
-//     name user|group TARGETS PENDING OLD NEW     NEW empty: deleted. PENDING: targets that no file line stands for
+//     name user|group TARGETS PENDING OLD NEW     NEW empty: deleted. PENDING: targets without a file line
 //     home make|move|remove NAME NEW UID GID INODE
-//     stage FOLDER                                with what is to be removed
+//     stage FOLDER                                with folders to be removed
 //     end
 //
-// It belongs to root alone, in /etc: it must outlive a restart of the machine. Whoever holds the system's lock on the password
-// files may read and write it.
+// It belongs to root and is in /etc, because it must survive a restart of the machine. The holder of the system's lock
+// on the password files may read and write it.
 #ifndef TAVO_ACCOUNT_DETAIL_COMMIT_MARKER_H
 #define TAVO_ACCOUNT_DETAIL_COMMIT_MARKER_H
 
@@ -33,7 +33,8 @@ enum Target : unsigned {
     kGuestModule = 32,
 };
 
-// What tells one file from another in its folder: it changes with every change of the file. "-" for one that does not exist.
+// What tells one file from another in its folder: it changes with every change of the file. "-" for one that does not
+// exist.
 std::string FileIdentity(const char *path);
 
 struct FileStep {

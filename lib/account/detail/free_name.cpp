@@ -1,4 +1,4 @@
-// Gets whatever stands at a name below /tmp out of the way.
+// Removes or renames the object at a name below /tmp.
 #include "account/detail/free_name.h"
 
 #include "core/detail/owner.h"

@@ -8,7 +8,7 @@ namespace tavo {
 
 class FtpChrootList {
   public:
-    // A name that stands there goes, and the new one comes at the end. False when the list cannot be read.
+    // Removes the old name, if listed, and appends the new one. Returns false when the list cannot be read.
     bool Rename(const std::string &old_name, const std::string &new_name);
 
     int Compose(unsigned target, AccountCommit &commit) { return names_.Compose(target, 0644, commit); }

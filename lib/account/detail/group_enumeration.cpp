@@ -12,7 +12,7 @@
 namespace tavo {
 namespace {
 
-// Local groups of the system itself are nobody's business, but for "users".
+// Local groups of the system itself are hidden, except "users".
 bool IsListed(const GroupLine &group, int flags)
 {
     if (group.gid == 0 && group.name != "root")

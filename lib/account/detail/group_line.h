@@ -24,10 +24,10 @@ std::string FormatGroupLine(const GroupLine &line);
 std::string FormatGroupDescLine(std::string_view name, std::string_view description);
 std::string_view GroupDescription(std::string_view line);
 
-// "nobody" is the user of those who are nobody, so it belongs to no group; empty names come from stray commas.
+// "nobody" is never a group member. Empty names (stray commas) are skipped.
 bool IsMember(std::string_view name);
 
-// Everybody is in "users", so nobody is listed there.
+// Every user is in "users", so its members are not listed.
 bool IsEverybody(std::string_view group_key);
 
 }  // namespace tavo

@@ -32,7 +32,7 @@ class GroupEntries {
 
   private:
     std::vector<StoreEntries> stores_{kGroupStores};
-    std::map<std::string, std::string, std::less<>> keys_;  // by name as it stands in the group file
+    std::map<std::string, std::string, std::less<>> keys_;  // by name, spelled as in the group file
     int32_t highest_ = TAVO_GROUP_GID_MIN - 1;
 };
 
@@ -63,7 +63,7 @@ void GroupEntries::AddDescription(std::string_view line)
         key = exact->second;
     else
         key = AccountKey(name, kGroupKeySize).value_or(std::string());
-    if (stores_[kGroupNameStore].contains(key))  // else nobody's line
+    if (stores_[kGroupNameStore].contains(key))  // otherwise a line without a group
         stores_[kDescStore].emplace(std::move(key), Value(line));
 }
 

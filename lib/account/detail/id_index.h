@@ -24,10 +24,13 @@ struct IdRange {
     int full;  // the code when every id is taken
 };
 
-// The id handed out last, for the first line of a text file. Without a record of it `id` stays. 0 or a code of the store.
+// The id handed out last, for the first line of a text file. Without a record of it `id` stays. 0 or a code of the
+// store.
 int ReadLastId(const Btree &index, std::string_view current_key, int32_t &id);
 
-// The next free id behind the one handed out last, round the end of the range. 0, ERR_DB_CURSOR, ERR_OUT_OF_MEMORY or range.full.
+// Finds the next free id after the one assigned last, and then from the beginning of the range. Returns 0,
+// ERR_DB_CURSOR,
+// ERR_OUT_OF_MEMORY or range.full.
 int FindFreeId(Btree &index, const IdRange &range, int32_t &id);
 
 }  // namespace tavo

@@ -19,7 +19,7 @@ inline constexpr char kUidMarker[] = "_@UID__INDEX@_";
 inline constexpr char kGidMarker[] = "_@GID__INDEX@_";
 inline constexpr char kMiscComment[] = "# record user misc, format \"user_name:user_privilege:user_mail\"\n";
 
-// 0, or ERR_FORMAT_ERROR when there are not three fields. A privilege that is no number reads as 0.
+// Returns 0, or ERR_FORMAT_ERROR when there are not three fields. A privilege that is not a number reads as 0.
 int ParseMiscLine(std::string_view text, MiscLine &line);
 
 std::string FormatMiscLine(const MiscLine &line);

@@ -28,7 +28,7 @@ void NameMap::Add(const NameStep &step)
         first_.erase(holder);
         names_[first] = step.new_name;
     } else if (!names_.emplace(first, step.new_name).second) {
-        return;  // nobody of this name was known before
+        return;  // this name was not known before
     }
     if (!step.new_name.empty())
         first_[KeyOf(prefix + step.new_name)] = first;

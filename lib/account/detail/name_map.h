@@ -12,8 +12,8 @@ namespace tavo {
 
 class NameMap {
   public:
-    // One change more, in the order in which they happened: "bob" to "carol" and then "alice" to "bob" leaves nobody with
-    // the rights of two.
+    // Adds the next change, in the order in which they happened: after "bob" to "carol" and "alice" to "bob", no
+    // account has the rights of two.
     void Add(const NameStep &step);
 
     // The new name, "" for a deleted one, nullptr for one that is as it was. Groups have "@" before their name.

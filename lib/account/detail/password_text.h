@@ -1,4 +1,4 @@
-// Passwords in the encodings that the Samba hashes are made of. What is no UTF-8 becomes the replacement character.
+// Passwords in the encodings of the Samba hashes. Bytes that are not UTF-8 become the replacement character.
 #ifndef TAVO_ACCOUNT_DETAIL_PASSWORD_TEXT_H
 #define TAVO_ACCOUNT_DETAIL_PASSWORD_TEXT_H
 
@@ -8,8 +8,8 @@
 
 namespace tavo {
 
-// Upper-case, character by character: "ß" stays one. A password that cannot be converted is never taken for an empty one:
-// 0, or ERR_OP_FAILURE when ICU cannot convert or cannot be loaded. Throws bad_alloc.
+// Upper-case, character by character: "ß" stays one. A password that cannot be converted is never taken for an empty
+// one: 0, or ERR_OP_FAILURE when ICU cannot convert or cannot be loaded. Throws bad_alloc.
 int UpperCodePage850(std::string_view utf8, SecretBytes &bytes);
 
 // UTF-16, the low byte of each unit first. The same codes.

@@ -6,17 +6,17 @@
 
 namespace tavo {
 
-// Excludes whoever locks the file as a process (smbd, smbpasswd), and belongs to the open file: no other close in this
-// process drops it. Tries until `seconds` have passed.
+// Excludes processes that lock the file with process locks (smbd, smbpasswd). The lock belongs to the open file:
+// closing another descriptor in this process does not drop it. Tries until `seconds` have passed.
 bool LockOpenFile(int fd, int seconds) noexcept;
 
 class SambaLock {
   public:
-    // Locks the file that has the name when the lock is held: a program that waited for a file which was replaced meanwhile
-    // opens the new one, and so do we. 0, also when there is no such file; ERR_LOCK_FAILED.
+    // Locks the file that has the name when the lock is held: a program that waited for a file which was replaced
+    // meanwhile opens the new one, and so do we. 0, also when there is no such file; ERR_LOCK_FAILED.
     int Take(int seconds) noexcept;
 
-    // The new file, before it gets the name: nobody changes it until its time stamps are recorded.
+    // Locks the new file before it gets the name, so that it does not change until its time stamps are recorded.
     void TakeNew(int fd) noexcept;
 
     void Release() noexcept;

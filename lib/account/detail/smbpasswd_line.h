@@ -18,7 +18,7 @@ struct SmbpasswdLine {
     std::string changed;  // "LCT-" and the seconds as 8 hexadecimal digits
 };
 
-// What stands in place of both hashes when there are none: Samba lets nobody in.
+// Replaces both hashes when there are none: Samba then refuses every login.
 inline constexpr char kNoSmbHash[] = "XXXXXXXXXXXXXXXXXXXXXXXXXXXXXXXX";
 
 // 0, or ERR_FORMAT_ERROR when there are not seven fields.

@@ -1,4 +1,4 @@
-// Builds the stores of a family anew from its text files.
+// Rebuilds the stores of a family from its text files.
 #include "account/detail/store_build.h"
 
 #include "account/detail/btree.h"
@@ -42,7 +42,7 @@ void RemoveLeftFolders(const StoreFamily &family)
     }
 }
 
-// A folder of our own in which nobody else can put anything, gone with what is in it.
+// A private folder, in which other users cannot create files; removed with its contents.
 class BuildFolder {
   public:
     explicit BuildFolder(const StoreFamily &family) : path_(std::string(family.prefix) + "tmp.XXXXXX")

@@ -1,4 +1,4 @@
-// Builds the stores of a family anew from its text files.
+// Rebuilds the stores of a family from its text files.
 #ifndef TAVO_ACCOUNT_DETAIL_STORE_BUILD_H
 #define TAVO_ACCOUNT_DETAIL_STORE_BUILD_H
 

@@ -14,7 +14,7 @@ inline std::string_view BytesOf(const void *bytes, int count)
     return {static_cast<const char *>(bytes), static_cast<size_t>(count)};
 }
 
-// A copy for the caller, with a NUL behind it: most values are texts. Empty when memory is out.
+// Returns a copy for the caller, followed by a NUL because most values are texts. Empty when memory is out.
 inline HeapBlock<void> CopyBytes(std::string_view bytes)
 {
     HeapBlock<void> copy(std::malloc(bytes.size() + 1));

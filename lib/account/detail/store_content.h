@@ -26,9 +26,9 @@ bool ReadTextFile(const char *path, std::string &text, int64_t &mtime);
 // The bytes of a 32-bit value of a reserved key.
 std::string NumberBytes(int32_t number);
 
-// The key of an account in the text files. Two names that differ in case only would share one, and an account be lost:
-// the second one is kept under its name as it stands, where no look-up finds it but every rewrite of the files does.
-// Empty for a name that is there already.
+// The key of an account in the text files. Two names that differ only in case would share a key, and one account would
+// be lost. So the second one is stored under its unchanged name, where look-ups do not find it but every rewrite of the
+// files does. Empty for a name that exists already.
 std::optional<std::string> FreeKey(const StoreEntries &taken, std::string_view name, size_t key_size);
 
 }  // namespace tavo

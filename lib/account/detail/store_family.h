@@ -1,4 +1,4 @@
-// The files of an account family: its stores, the text files that they mirror, and what lies beside them.
+// The files of an account family: its stores, the text files that they mirror, and the files beside them.
 #ifndef TAVO_ACCOUNT_DETAIL_STORE_FAMILY_H
 #define TAVO_ACCOUNT_DETAIL_STORE_FAMILY_H
 
@@ -10,7 +10,7 @@
 
 namespace tavo {
 
-// Stores belong to root: what others may write is never read back as truth, and hashes are nobody else's business.
+// Stores belong to root: files that other users may write are never trusted, and only root may read hashes.
 inline constexpr unsigned kPublicStore = 0644;
 inline constexpr unsigned kSecretStore = 0600;
 

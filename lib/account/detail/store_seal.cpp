@@ -28,7 +28,7 @@ std::string RunOfTheMachine()
     return ReadSmall(OpenFd("/proc/sys/kernel/random/boot_id", O_RDONLY));
 }
 
-// One line that changes with every change of the file. False for what is no plain file.
+// Appends a line that changes with every change of the file. Returns false for anything but a regular file.
 bool AddLine(std::string &text, const char *path, bool may_be_missing)
 {
     struct stat st;
@@ -115,7 +115,7 @@ try {
     const std::string text = SealText(family, texts);
     if (text.empty())
         return;
-    TempFile seal;  // under a name that nobody can take first
+    TempFile seal;  // under a name that other users cannot guess
     if (!seal.CreateBeside(family.seal) || !WriteAll(seal.Descriptor(), text))
         return;
     const std::string path = family.seal;

@@ -4,9 +4,9 @@
 
 namespace tavo {
 
-// The database syncs a store three times when it closes it. The stores are a cache under /tmp that is built anew after
-// every start of the machine, so each of these waits for the disk would be for nothing. While one of these lives, the
-// calling thread's syncs inside the database do nothing; other threads' go to disk as ever.
+// The database syncs a store three times when it closes it. The stores are a cache under /tmp that is rebuilt after
+// every start of the machine, so syncing them is wasted work. While this object exists, the calling thread's syncs
+// inside the database do nothing; other threads' syncs work as usual.
 class NoStoreSync {
   public:
     NoStoreSync() noexcept;

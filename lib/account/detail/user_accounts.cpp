@@ -11,7 +11,7 @@
 namespace tavo {
 namespace {
 
-constexpr std::string_view kLocked = "*";  // the hash of an account without a shadow line: nobody logs in with it
+constexpr std::string_view kLocked = "*";  // the hash of an account without a shadow line: it allows no login
 
 int Privilege(std::string_view key, const MiscLine &misc)
 {

@@ -33,8 +33,8 @@ struct DoneUser {
 
 class UserBatch {
   public:
-    // `is_pending`: whether rights of a deleted or renamed account of that key are still to be taken away. Nobody gets its
-    // name until they are.
+    // `is_pending`: whether rights of a deleted or renamed account of that key still have to be removed. Until then no
+    // account can get its name.
     UserBatch(const TAVOUSERDB &db, std::function<bool(const std::string &key)> is_pending)
         : db_(db), is_pending_(std::move(is_pending))
     {
@@ -45,7 +45,7 @@ class UserBatch {
         int code = 0;
         bool damaged = false;
         bool duplicate = false;  // the old name was given before
-        bool absent = false;     // the old name is no account
+        bool absent = false;     // the old name is not an account
     };
 
     Outcome Apply(const char *old_name, const TAVOUSER *user);

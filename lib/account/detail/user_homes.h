@@ -29,14 +29,14 @@ HomePlan PlanRemovals(std::span<const std::string> names, Marker &marker);
 enum class HomeResult {
     kDone,       // also when there is nothing to do any more
     kFailed,     // errno says why
-    kElsewhere,  // the folder is on another file system: it is moved when nobody waits
+    kElsewhere,  // the folder is on another file system: it is moved after the locks are released
 };
 
 // One step by one rename or mkdir.
 HomeResult TakeHomeStep(const HomeStep &step, const std::vector<std::string> &stages);
 
-// What takes its time: moves a folder from another file system, removes a staging folder with what is in it (false when that
-// fails; true when somebody else is at it, with `theirs`).
+// What takes its time: moves a folder from another file system, removes a staging folder with what is in it (false when
+// that fails; true when somebody else is at it, with `theirs`).
 bool MoveHomeElsewhere(const HomeStep &step, const std::vector<std::string> &stages);
 bool RemoveStage(const std::string &path, bool &theirs);
 

@@ -44,7 +44,7 @@ class UserEntries {
     void KeepPassword(const std::string &key, const PasswdLine &account, std::string_view password);
 
     std::vector<StoreEntries> stores_{kUserStores};
-    std::map<std::string, std::string, std::less<>> keys_;  // by name as it stands in passwd
+    std::map<std::string, std::string, std::less<>> keys_;  // by name, spelled as in passwd
     StoreEntries kept_;                                     // passwords from passwd itself
     int32_t highest_ = TAVO_USER_UID_MIN - 1;
 };
@@ -57,7 +57,7 @@ void UserEntries::AddPasswd(std::string_view line)
     const std::optional<std::string> key = FreeKey(stores_[kNameStore], account.name, kUserKeySize);
     if (!key)
         return;
-    // As it stands, but for the password: from here on that is in the shadow file alone.
+    // The line unchanged, except for the password, which from here on is only in the shadow file.
     const std::string_view password = SplitColons(line)[1];
     const size_t rest = account.name.size() + 1 + password.size();
     stores_[kNameStore].emplace(*key, Value(account.name + ":x" + std::string(line.substr(rest))));
@@ -86,7 +86,7 @@ void UserEntries::AddLine(UserStoreIndex store, std::string_view line)
         key = exact->second;
     else
         key = AccountKey(name).value_or(std::string());
-    if (stores_[kNameStore].contains(key))  // else nobody's line
+    if (stores_[kNameStore].contains(key))  // otherwise a line without an account
         stores_[store].emplace(std::move(key), Value(line));
 }
 

@@ -1,4 +1,4 @@
-// Tells whether a group name is acceptable.
+// Checks whether a group name is acceptable.
 #include "tavo_group.h"
 
 #include "account/detail/account_name.h"

@@ -1,4 +1,4 @@
-// Tells the quota format of a volume.
+// Reads the quota format of a volume.
 #include "tavo_quota.h"
 
 #include "core/detail/fault.h"

@@ -1,4 +1,4 @@
-// Tells whether the model has quotas.
+// Checks whether the model has quotas.
 #include "tavo_quota.h"
 
 #include "core/detail/keep_fault.h"

@@ -1,4 +1,4 @@
-// Tells how many more accounts may be created.
+// Computes how many more accounts may be created.
 #include "tavo_user.h"
 
 #include "core/detail/fault.h"

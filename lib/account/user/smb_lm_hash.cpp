@@ -12,7 +12,7 @@ namespace {
 
 constexpr size_t kHalf = 7, kBlock = 8;
 
-// Seven bytes are a key: 56 bits, spread over eight bytes whose lowest bit is the parity that nobody checks.
+// Seven bytes are a key: 56 bits, spread over eight bytes whose lowest bit is an unchecked parity bit.
 void EncryptMagic(const tavo::Extras &extras, const uint8_t *half, uint8_t *out)
 {
     uint64_t bits = 0;

@@ -1,4 +1,4 @@
-// Tells whether an account has expired.
+// Checks whether an account has expired.
 #include "tavo_user.h"
 
 #include "account/detail/user_owner.h"

@@ -21,7 +21,7 @@ namespace {
 
 struct Doomed {
     std::string key;
-    std::string name;  // as it stands in the store
+    std::string name;  // spelled as in the store
     int32_t uid;
 };
 

@@ -14,7 +14,7 @@ extern "C" int TAVOUserExpiredDateFill(TAVOUSER *pUser, const char *szDate)
     struct tm date = {};
     const char *end = ::strptime(szDate, "%Y/%m/%d", &date);
     const struct tm wanted = date;
-    // Midnight of that date in the zone of nobody: the same day number whatever the zone and its summer time do.
+    // Midnight of that date in UTC: the day number does not depend on the time zone and its summer time.
     const int64_t seconds = end && !*end ? int64_t{::timegm(&date)} : 0;
     if (!end || *end || date.tm_mday != wanted.tm_mday || date.tm_mon != wanted.tm_mon) {
         LogError("%s:%d Invalid date:%s or format:\"yyyy/mm/dd\"", szDate);

@@ -1,4 +1,4 @@
-// Tells whether a day has passed in the appliance's time zone.
+// Checks whether a day has passed in the appliance's time zone.
 #include "tavo_user.h"
 
 #include "account/detail/shadow_line.h"

@@ -1,4 +1,4 @@
-// Tells whether a user name is acceptable.
+// Checks whether a user name is acceptable.
 #include "tavo_user.h"
 
 #include "account/detail/account_name.h"

@@ -17,7 +17,7 @@ namespace tavo {
 constexpr mode_t kWritableByOthers = S_IWGRP | S_IWOTH;
 constexpr mode_t kPermissions = 07777;
 
-// Gives a new file the permissions that a strict umask has removed.
+// Restores the permissions of a new file that a strict umask has removed.
 void RestoreMode(int fd, mode_t mode) noexcept;
 
 // open(2) with O_CLOEXEC, O_NOCTTY and O_NONBLOCK added; empty with errno on failure. A file that it creates has

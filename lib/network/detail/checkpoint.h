@@ -1,7 +1,7 @@
-// The network as it was before a change: put back when a step fails, and by the next change when the process dies.
+// The state of the network before a change: restored when a step fails, and by the next change when the process dies.
 //
-// A snapshot is taken from files, /proc, /sys and ioctl, and runs no command. The record lies on the disk from before the
-// first step until the change is over: /etc/network.undo. A change that succeeds leaves nothing.
+// A snapshot is taken from files, /proc, /sys and ioctl, and runs no command. The record is on the disk from before the
+// first step until the end of the change: /etc/network.undo. A successful change removes it.
 #ifndef TAVO_NETWORK_DETAIL_CHECKPOINT_H
 #define TAVO_NETWORK_DETAIL_CHECKPOINT_H
 
@@ -33,7 +33,8 @@ class Checkpoint {
     void AddHostName();
     void AddMtu(const std::string &interface);
     void AddGateway();  // the kernel's default routes
-    // Address, routes and DHCP client. The address is that of the interface file or of the lease; of neither, the kernel's.
+    // Address, routes and DHCP client. The address is that of the interface file or of the lease; of neither, the
+    // kernel's.
     void AddCard(const std::string &interface);
     // Everything that an interface has in the kernel, and only that.
     void AddLiveCard(const std::string &interface);
@@ -52,11 +53,12 @@ class Checkpoint {
     // Puts back all that was added, by the stated tools, and ends. Routes that the kernel still has are only left alone
     // when `cleared` is false. False when an address could not be set.
     bool PutBack(bool cleared = true);
-    // The same where nobody knows what the last command has done.
+    // The same when the effect of the last command is not known.
     void PutBackAll();
     void PutBackFiles();
 
-    // Notes a command that is about to be started (`pid` is 0, `beginning` "-") or runs, so that whoever finishes ends it first.
+    // Records a command that is about to be started (`pid` is 0, `beginning` "-") or runs, so that a process that
+    // completes the change ends it first.
     static void NoteCommand(pid_t pid, const std::string &beginning, std::string_view command);
 
     void Add(UndoStep step) { steps_.push_back(std::move(step)); }

@@ -15,8 +15,8 @@
 namespace tavo {
 namespace {
 
-// Each of these is false when a look or a command failed that may well succeed the next time. A gateway on no network of
-// ours is refused each time.
+// Each of these is false when a look or a command failed that may well succeed the next time. A gateway on no network
+// of ours is refused each time.
 bool RepairConnected(const std::vector<Route> &routes, const std::string &interface)
 {
     const auto found = AddressOf(interface);
@@ -86,7 +86,8 @@ std::vector<Route> LiveRoutes()
 
 void RepairRoutes(const std::string &interface, bool dhcp)
 {
-    // Without its default route the appliance is cut off from whoever manages it, so a passing failure must not cost it.
+    // Without its default route the appliance is cut off from its administrator, so a temporary failure must not remove
+    // it.
     if (!TryRepair(interface, dhcp))
         TryRepair(interface, dhcp);
 }

@@ -15,7 +15,7 @@
 namespace tavo {
 namespace {
 
-// What the name stands for while no card has an address: local programs look it up all the same.
+// The address of the host name while no card has one: local programs still look the name up.
 constexpr const char *kNoAddress = "127.0.1.1";
 
 // A line that says nothing but what the two managed lines say.

@@ -21,7 +21,7 @@ std::string Ipv6Text(const in6_addr &address);
 // An address that an interface can have: neither "::" nor a multicast one.
 bool IsHostAddress(const in6_addr &address) noexcept;
 
-// Whether no bit behind the first `length` is set.
+// Returns whether only the first `length` bits are set.
 bool IsNetwork(const in6_addr &address, int length) noexcept;
 
 // "ADDRESS/LENGTH" of every address that the interface has, from the text of /proc/net/if_inet6, in its order.

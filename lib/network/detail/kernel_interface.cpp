@@ -36,7 +36,7 @@ std::optional<bool> IsWired(const std::string &interface)
     return is_absent() ? std::optional(true) : std::nullopt;
 }
 
-// By the letters, then by the number behind them.
+// By the letters, then by the number after them.
 bool ComesBefore(const std::string &left, const std::string &right)
 {
     const auto split = [](const std::string &name) {

@@ -7,8 +7,8 @@
 
 namespace tavo {
 
-// Runs a composed command, and notes it for whoever has to finish the change if this process dies meanwhile. As RunCommand or, quietly, as
-// RunCommandQuietly.
+// Runs a composed command, and records it for the process that has to complete the change if this one dies meanwhile.
+// Returns as RunCommand or, quietly, as RunCommandQuietly.
 int RunNetText(const std::string &command, bool quietly = false);
 
 // The exit status; -1 when the command could not be composed or run, or was killed.

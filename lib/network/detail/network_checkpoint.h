@@ -1,5 +1,5 @@
-// A checkpoint of the whole network, which somebody takes for as long as he lives: /etc/network.checkpoint. When he has
-// died without an end of it, the network goes back to it.
+// A checkpoint of the whole network, which belongs to the process that took it: /etc/network.checkpoint. When that
+// process has died without ending it, the network is restored.
 #ifndef TAVO_NETWORK_DETAIL_NETWORK_CHECKPOINT_H
 #define TAVO_NETWORK_DETAIL_NETWORK_CHECKPOINT_H
 

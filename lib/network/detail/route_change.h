@@ -21,7 +21,7 @@ struct Ipv6Route {
     std::optional<in6_addr> gateway;  // none: the network is on the link
 };
 
-// Empty when a text is no address, the mask has holes or the network has bits behind it.
+// Empty when a text is not an address, the mask has holes or the network has bits outside of it.
 std::optional<Ipv4Route> ParseRoute(const char *network, const char *mask) noexcept;
 std::optional<Ipv6Route> ParseRoute(const char *network, int length, const char *gateway) noexcept;
 

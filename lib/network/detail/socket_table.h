@@ -7,7 +7,7 @@
 
 namespace tavo {
 
-// The local port of one row ("   0: 0100007F:1F90 00000000:0000 0A ..."); empty for the header and for what is no row.
+// The local port of one row ("   0: 0100007F:1F90 00000000:0000 0A ..."); empty for the header and for other text.
 std::optional<int> LocalPort(std::string_view row) noexcept;
 
 }  // namespace tavo

@@ -35,7 +35,7 @@ struct UndoStep {
     std::string target;
     std::string value;
     std::string more;
-    bool after_death = false;  // only needed when nobody knows how far the change came
+    bool after_death = false;  // only needed when the progress of the change is not known
 
     bool IsOfFiles() const
     {

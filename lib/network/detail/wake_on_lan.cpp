@@ -1,4 +1,4 @@
-// Wake-on-LAN: what the model and its settings allow, and what a card is told.
+// Wake-on-LAN: the limits of the model and its settings, and the configuration of a card.
 #include "network/detail/wake_on_lan.h"
 
 #include "core/detail/owner.h"

@@ -1,4 +1,4 @@
-// Tells the stored MTU of an interface.
+// Reads the stored MTU of an interface.
 #include "tavo_net.h"
 
 #include "tavo_file.h"
@@ -14,7 +14,7 @@
 
 namespace {
 
-// An interface for which none is stored has the default: that is no failure.
+// An interface without a stored MTU has the default, which is not a failure.
 template <size_t Size>
 bool Read(const char *interface, char (&value)[Size])
 {

@@ -1,4 +1,4 @@
-// Tells the stored MTU of an interface as a number.
+// Reads the stored MTU of an interface as a number.
 #include "tavo_net.h"
 
 #include "core/detail/fault.h"

@@ -1,4 +1,4 @@
-// Tells the host name that is stored.
+// Reads the stored host name.
 #include "tavo_net.h"
 
 #include "tavo_file.h"

@@ -1,4 +1,4 @@
-// Tells whether an interface gets its address from DHCP.
+// Checks whether an interface gets its address from DHCP.
 #include "tavo_net.h"
 
 #include "tavo_file.h"

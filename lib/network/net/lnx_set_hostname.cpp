@@ -1,4 +1,4 @@
-// Gives the appliance another host name: in the kernel, in the stored settings and in /etc/hosts.
+// Sets the host name: in the kernel, in the stored settings and in /etc/hosts.
 #include "tavo_net.h"
 
 #include "tavo_file.h"

@@ -1,4 +1,4 @@
-// Tells the default gateway that the kernel uses.
+// Reads the default gateway that the kernel uses.
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"

@@ -1,4 +1,4 @@
-// Tells the default gateway that is stored.
+// Reads the stored default gateway.
 #include "tavo_net.h"
 
 #include "tavo_file.h"

@@ -45,7 +45,7 @@ int SetGateway(const std::string &gateway)
     }
     if (const int status = tavo::RunNetCommand("/sbin/route add default gw %s > /dev/null 2>&1", gateway)) {
         LogError("%s(%d): failed to set default gateway.");
-        // Without a route the appliance would be cut off from whoever sets it.
+        // Without a route the appliance would be cut off from its administrator.
         const auto added = tavo::ParseIpv4(gateway);
         if (status == -1 || HasDefault(&*added))
             before.PutBackAll();

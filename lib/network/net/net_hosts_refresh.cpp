@@ -1,5 +1,5 @@
-// Finishes a change that was cut off, and brings /etc/hosts up to date: for the start of the network and the hook of the
-// DHCP client.
+// Finishes a change that was cut off, and brings /etc/hosts up to date: for the start of the network and the hook of
+// the DHCP client.
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"
@@ -8,7 +8,7 @@
 extern "C" int TAVONetHostsRefresh(void)
 {
     return Guard([] {
-        // Never waits: whoever holds the lock may be waiting for the client whose hook this is.
+        // Never waits: the holder of the lock may be waiting for the client whose hook calls this.
         const tavo::LockHold lock(tavo::kNetworkExclusive, 0);
         if (!lock)
             return TLIBErrGet() == ERR_LOCK_FAILED ? 1 : Fail(TLIBErrGet());

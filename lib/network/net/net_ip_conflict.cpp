@@ -1,4 +1,4 @@
-// Tells whether another host uses an address.
+// Checks whether another host uses an address.
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"

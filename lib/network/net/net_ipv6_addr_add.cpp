@@ -1,4 +1,4 @@
-// Gives an interface an IPv6 address.
+// Adds an IPv6 address to an interface.
 #include "tavo_net.h"
 
 #include "network/detail/ipv6_change.h"

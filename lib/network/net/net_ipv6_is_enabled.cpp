@@ -1,4 +1,4 @@
-// Tells whether an interface speaks IPv6.
+// Checks whether IPv6 is enabled on an interface.
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"

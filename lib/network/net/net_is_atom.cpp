@@ -1,4 +1,4 @@
-// Tells whether a text is one atom of a mail address.
+// Checks whether a text is one atom of a mail address.
 #include "tavo_net.h"
 
 #include "core/detail/fault.h"

@@ -1,4 +1,4 @@
-// Tells whether an interface has a carrier: a cable with something at its other end.
+// Checks whether an interface has a carrier: a cable is plugged in and the other end is up.
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"

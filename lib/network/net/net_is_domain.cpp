@@ -1,4 +1,4 @@
-// Tells whether a text is a domain name.
+// Checks whether a text is a domain name.
 #include "tavo_net.h"
 
 #include "core/detail/fault.h"

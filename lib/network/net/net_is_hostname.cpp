@@ -1,4 +1,4 @@
-// Tells whether a text can be the appliance's host name, which is its name in Windows networks too.
+// Checks whether a text can be the appliance's host name, which is also its name in Windows networks.
 #include "tavo_net.h"
 
 #include "core/detail/fault.h"

@@ -1,4 +1,4 @@
-// Tells whether a text is an IPv4 address that a host can have.
+// Checks whether a text is an IPv4 address that a host can have.
 #include "tavo_net.h"
 
 #include "core/detail/fault.h"

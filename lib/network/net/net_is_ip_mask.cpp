@@ -1,4 +1,4 @@
-// Tells whether a text is a contiguous IPv4 mask and writes it in its canonical form.
+// Checks whether a text is a contiguous IPv4 mask and writes it in its canonical form.
 #include "tavo_net.h"
 
 #include "core/detail/fault.h"

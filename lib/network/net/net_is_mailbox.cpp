@@ -1,4 +1,4 @@
-// Tells whether a text is a mail address.
+// Checks whether a text is a mail address.
 #include "tavo_net.h"
 
 #include "core/detail/fault.h"

@@ -1,4 +1,4 @@
-// Tells whether a socket of this appliance holds a port.
+// Checks whether a socket of this appliance uses a port.
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"

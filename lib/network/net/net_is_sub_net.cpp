@@ -1,4 +1,4 @@
-// Tells whether a text is an IPv4 address and a contiguous mask, joined by a slash.
+// Checks whether a text is an IPv4 address and a contiguous mask, joined by a slash.
 #include "tavo_net.h"
 
 #include "core/detail/fault.h"

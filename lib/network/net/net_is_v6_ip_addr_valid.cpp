@@ -1,4 +1,4 @@
-// Tells whether a text is an IPv6 address.
+// Checks whether a text is an IPv6 address.
 #include "tavo_net.h"
 
 #include "core/detail/fault.h"

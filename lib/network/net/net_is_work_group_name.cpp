@@ -1,4 +1,4 @@
-// Tells whether a text can be the name of a Windows workgroup.
+// Checks whether a text can be the name of a Windows workgroup.
 #include "tavo_net.h"
 
 #include "core/detail/fault.h"

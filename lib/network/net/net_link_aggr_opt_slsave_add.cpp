@@ -14,7 +14,7 @@ extern "C" int TAVONetLinkAggrOptSlsaveAdd(TAVONETLINKAGGR *pAggr, const char *s
         !tavo::IsInterfaceName(szInterface))
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        // A bond is no member of a bond, and neither is what is not Ethernet.
+        // A bond cannot be a member of a bond, and neither can an interface that is not Ethernet.
         if (tavo::InterfaceAttribute(szInterface, "type") != "1" ||
             !tavo::InterfaceAttribute(szInterface, "bonding/mode").empty())
             return Fail(ERR_LINK_AGGR_TYPE);

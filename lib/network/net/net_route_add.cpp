@@ -1,4 +1,4 @@
-// Adds a route to a network behind an interface.
+// Adds a route to a network through an interface.
 #include "tavo_net.h"
 
 #include "network/detail/route_change.h"

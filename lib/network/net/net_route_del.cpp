@@ -1,4 +1,4 @@
-// Removes a route to a network behind an interface.
+// Removes a route to a network through an interface.
 #include "tavo_net.h"
 
 #include "network/detail/route_change.h"

@@ -1,4 +1,4 @@
-// Gives the first interface its address: from DHCP, or a static one.
+// Sets the address of an interface: from DHCP, or a static one.
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"

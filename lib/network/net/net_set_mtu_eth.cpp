@@ -1,4 +1,4 @@
-// Gives an interface its MTU in the kernel.
+// Sets the MTU of an interface in the kernel.
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"

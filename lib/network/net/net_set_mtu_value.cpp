@@ -1,4 +1,4 @@
-// Gives the kernel the MTU of an interface, and stores it for the next start.
+// Sets the MTU of an interface in the kernel and stores it for the next start.
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"

@@ -11,7 +11,8 @@ namespace {
 
 constexpr size_t kBuffer = 64;  // what every caller of the two conversions brings
 
-// Any base that C knows ("010" is 8, "0x18" is 24): pages and scripts that write it so exist. 0 when it is no length.
+// Reads any base of C ("010" is 8, "0x18" is 24), because existing pages and scripts use them. 0 when it is not a
+// length.
 int ReadLength(const char *text)
 {
     char *end = nullptr;

@@ -1,4 +1,4 @@
-// Tells whether an interface wakes the appliance.
+// Checks whether an interface wakes the appliance.
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"
@@ -16,7 +16,7 @@ extern "C" int TAVONetWolGet(const char *szInterface)
             LogError("%s:%d Wake-on-lan isn't supported.");
             return Fail(ERR_OP_UNREGISTERED);
         }
-        // The panel's controller answers no questions: what it was told last is noted.
+        // The panel's controller cannot be queried, so the last setting is stored.
         if (tavo::IsWokenByPanel()) {
             const std::string told = tavo::ReadSetting("/etc/tavoinfo.conf", tavo::WakeOptionsKey(szInterface).c_str());
             return tavo::ParseWakeOptions(told).value_or(0) != 0 ? 1 : 0;

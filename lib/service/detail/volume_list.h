@@ -29,7 +29,7 @@ std::string_view VolumeOf(std::string_view path) noexcept;
 
 std::vector<Volume> MountedVolumes();
 
-// Remote by its file system or source; external by a file system of removable disks, or a disk behind USB.
+// Remote by its file system or source; external by a file system of removable disks, or a disk on USB.
 VolumeKind KindOf(const Volume &volume);
 
 // Returns the kind of the mounted volume that holds `path`; -1 when there is none.

@@ -13,7 +13,7 @@ namespace tavo {
 
 inline constexpr std::string_view kArray = "/dev/md";
 
-// A decimal number as it stands in the name of an array: no sign, no leading zeros, within a minor number's 20 bits.
+// A decimal number in the name of an array: no sign, no leading zeros, within a minor number's 20 bits.
 inline std::optional<int> ArrayNumberText(std::string_view text)
 {
     if (text.empty() || text.size() > 7 || text[0] < '0' || text[0] > '9' || (text.size() > 1 && text[0] == '0'))

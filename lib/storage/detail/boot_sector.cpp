@@ -17,8 +17,8 @@ constexpr size_t kStartAt = 8;
 constexpr size_t kCountAt = 12;
 constexpr unsigned char kGuidTable = 0xEE;
 
-// Each probe steps on from the one before by this many bytes more than the last step, so that entries 1, 2 and 4 are
-// looked at and the last probe lies behind the sector. Tools rely on what this finds: an entry 3 of that type alone has
+// Each probe steps on from the one before by this many bytes more than the last step, so that entries 1, 2 and 4
+// are read and the last probe is after the sector. Tools rely on what this finds: an entry 3 of that type alone has
 // always made an MS-DOS table.
 constexpr size_t kProbeSteps[] = {0, 16, 32, 48};
 

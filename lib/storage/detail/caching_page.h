@@ -9,12 +9,12 @@
 
 namespace tavo {
 
-// Where the page stands in what MODE SENSE(6) gave; empty when it is not there whole.
+// Returns the offset of the page in the answer to MODE SENSE(6); empty when the page is missing or incomplete.
 std::optional<size_t> FindCachingPage(std::span<const uint8_t> mode_data);
 
 struct CachingPage {
     std::vector<uint8_t> mode_data;  // the whole answer, up to the end of the page
-    size_t page;                     // where the page stands in it
+    size_t page;                     // offset of the page
 
     bool IsOn() const;
 };

@@ -12,7 +12,8 @@ inline constexpr int kLastPartition = 15;
 // The devices on top of the one of that kernel name ("md0"), separated by blanks; empty without any.
 std::string HoldersOf(std::string_view name);
 
-// Who uses the device of that path: its holders, else "a file system or swap". Empty when nobody does, or it is not there.
+// Returns the users of the device of that path: its holders, else "a file system or swap". Empty when it is unused or
+// does not exist.
 std::string UserOf(const std::string &path);
 
 // The same for partitions first to last of a disk, as "/dev/sda3 is in use: md2"; also for the disk itself when a file

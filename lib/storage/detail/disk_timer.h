@@ -4,7 +4,7 @@
 
 namespace tavo {
 
-// `value` as ATA encodes it. False when a disk that is there refused; the others have it all the same.
+// Sets `value`, as ATA encodes it, on all disks. Returns false when a present disk refused; the others have it then.
 bool SetTimerOfAllDisks(int value);
 
 }  // namespace tavo

@@ -24,7 +24,7 @@ std::string_view Trimmed(std::string_view text)
     return text.substr(begin, text.find_last_not_of(kBlanks) + 1 - begin);
 }
 
-// What stands before a remark in brackets: "naslab:0  (local to host naslab)".
+// Returns the text before a remark in brackets: "naslab:0  (local to host naslab)".
 std::string_view WithoutRemark(std::string_view value)
 {
     const size_t bracket = value.find(" (");

@@ -10,7 +10,7 @@
 namespace tavo {
 namespace {
 
-// From a disk's device up: target, host, interface, device. A few more for what stands between in other kernels.
+// From a disk's device up: target, host, interface, device. A few more for additional levels in other kernels.
 constexpr int kLevels = 8;
 
 std::optional<unsigned> ReadUsbId(const std::string &path)

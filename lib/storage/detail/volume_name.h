@@ -30,7 +30,7 @@ struct VolumeName {
     bool operator==(const VolumeName &) const = default;
 };
 
-// "/dev/vg1/lv", or "/dev/mapper/vg1-lv" where a "-" of a name stands twice. Empty for other text.
+// "/dev/vg1/lv", or "/dev/mapper/vg1-lv" where a "-" of a name is doubled. Empty for other text.
 std::optional<VolumeName> ParseVolumePath(std::string_view path);
 
 // The volume `name` is a snapshot of `volume`: its name, "s" and perhaps a number.

@@ -1,4 +1,4 @@
-// Tells where a disk sits.
+// Finds where a disk sits.
 #include "tavo_disk.h"
 
 #include "core/detail/ascii.h"

@@ -1,4 +1,4 @@
-// Gives the device numbers of all whole disks.
+// Lists the device numbers of all whole disks.
 #include "tavo_disk.h"
 
 #include "core/detail/guard.h"

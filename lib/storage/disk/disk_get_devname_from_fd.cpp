@@ -1,4 +1,4 @@
-// Names the disk or partition behind an open descriptor.
+// Returns the path of the disk or partition of an open descriptor.
 #include "tavo_disk.h"
 
 #include "core/detail/guard.h"
@@ -28,7 +28,7 @@ extern "C" char *TAVODiskGetDevnameFromFd(int fd)
             return FailNull(ERR_NO_DISK_ID);
         std::string path(tavo::kDev);
         path += tavo::LastPart({target, static_cast<size_t>(length)});
-        std::replace(path.begin(), path.end(), '!', '/');  // how a slash in the device's name stands in /sys
+        std::replace(path.begin(), path.end(), '!', '/');  // /sys writes "!" for a slash in the device's name
         char *const copy = ::strdup(path.c_str());
         return copy ? copy : FailNull(ERR_OUT_OF_MEMORY);
     });

@@ -10,7 +10,7 @@
 extern "C" int TAVODiskGetFileSBTimerSetting(void)
 {
     return Guard([&] {
-        // A missing key is no failure: a new appliance has never saved one.
+        // A missing key is not a failure: a new appliance has never saved one.
         tavo::Result<tavo::FoundLine> line = tavo::FindLineByKey(tavo::kSettings, "standbytimer", tavo::Match::first);
         const auto minutes = line ? tavo::StrictNumber<int>(tavo::LineValue(line->text)) : std::nullopt;
         return minutes && *minutes >= 0 ? *minutes : -1;

@@ -1,4 +1,4 @@
-// Gives the summary of the disk with a device number.
+// Reads the summary of the disk with a device number.
 #include "tavo_disk.h"
 
 #include "core/detail/guard.h"

@@ -1,4 +1,4 @@
-// Gives the saved spin-down minutes.
+// Reads the saved spin-down minutes.
 #include "tavo_disk.h"
 
 #include "core/detail/fault.h"

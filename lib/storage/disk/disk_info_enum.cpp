@@ -19,7 +19,8 @@ struct FreeList {
 
 class Gathered {
   public:
-    // False when memory ran out. A bay or slot without a disk is no failure, and neither is a disk that cannot be read.
+    // Returns false when memory ran out. An empty bay or slot is not a failure, and neither is a disk that cannot be
+    // read.
     bool Add(const char *path)
     {
         if (!tavo::HasNode(path))

@@ -1,4 +1,4 @@
-// Tells whether a disk can be opened.
+// Checks whether a disk can be opened.
 #include "tavo_disk.h"
 
 #include "core/detail/fault.h"

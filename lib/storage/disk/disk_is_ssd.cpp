@@ -1,4 +1,4 @@
-// Tells whether a drive has no rotating medium.
+// Checks whether a drive has no rotating medium.
 #include "tavo_disk.h"
 
 #include "core/detail/guard.h"

@@ -1,4 +1,4 @@
-// Gives the size of a disk or partition in sectors.
+// Reads the size of a disk or partition in sectors.
 #include "tavo_disk.h"
 
 #include "core/detail/fault.h"

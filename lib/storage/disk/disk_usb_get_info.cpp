@@ -1,4 +1,4 @@
-// Gives the size of a device by its kernel name.
+// Reads the size of a device by its kernel name.
 #include "tavo_disk.h"
 
 #include "core/detail/guard.h"

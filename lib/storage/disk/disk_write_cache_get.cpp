@@ -1,4 +1,4 @@
-// Tells whether the write cache of a drive is on.
+// Checks whether the write cache of a drive is on.
 #include "tavo_disk.h"
 
 #include "core/detail/guard.h"

@@ -1,4 +1,4 @@
-// Tells whether a stick carries a FAT or NTFS file system without a partition table.
+// Checks whether a stick carries a FAT or NTFS file system without a partition table.
 #include "tavo_disk.h"
 
 #include "storage/detail/boot_sector.h"

@@ -1,4 +1,4 @@
-// Gives the model of a drive.
+// Reads the model of a drive.
 #include "tavo_disk.h"
 
 #include "core/detail/guard.h"

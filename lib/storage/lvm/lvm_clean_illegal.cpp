@@ -21,7 +21,7 @@ bool IsMounted(std::string_view group)
 {
     std::vector<tavo::Mount> mounts;
     if (!tavo::ReadMounts(mounts))
-        return true;  // nobody knows
+        return true;  // not known
     for (const tavo::Mount &mount : mounts) {
         const auto source = tavo::ParseVolumePath(mount.source);
         if (source && tavo::LastPart(group) == source->group)

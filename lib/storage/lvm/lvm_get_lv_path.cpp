@@ -1,4 +1,4 @@
-// Gives the logical volume on a device.
+// Finds the logical volume on a device.
 #include "tavo_lvm.h"
 
 #include "core/detail/command_output.h"

@@ -1,4 +1,4 @@
-// Tells whether the model uses LVM.
+// Checks whether the model uses LVM.
 #include "tavo_lvm.h"
 
 #include "core/detail/guard.h"

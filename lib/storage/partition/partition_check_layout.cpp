@@ -1,4 +1,4 @@
-// Tells whether a disk carries a layout of the system.
+// Checks whether a disk carries a layout of the system.
 #include "tavo_partition.h"
 
 #include "core/detail/guard.h"

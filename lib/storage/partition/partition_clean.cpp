@@ -14,7 +14,7 @@ namespace {
 constexpr int kFirstData = 3;
 constexpr int kLastSystem = 2;
 
-// From the last one on: a logical partition that goes renumbers those behind it. Most are not there.
+// Called from the last partition down: removing a logical partition renumbers those after it. Most do not exist.
 void Empty(const char *disk, int number)
 {
     const tavo::CommandResult result =
@@ -29,8 +29,8 @@ bool IsReached(int number)
     return number == 1 || number == kFirstData;
 }
 
-// Erases superblocks that the commands below would miss, and that would start the old array when the partitions are made
-// again.
+// Erases superblocks that the commands below would miss, and that would start the old array when the partitions are
+// made again.
 int EraseFirst(const std::string &disk, int first, int last)
 {
     for (int number = first; number <= last; ++number) {

@@ -1,4 +1,4 @@
-// Tells whether a partition is an extended one.
+// Checks whether a partition is an extended one.
 #include "tavo_disk.h"
 #include "tavo_partition.h"
 

@@ -1,4 +1,4 @@
-// Tells the kind of a disk's partition table.
+// Finds the kind of a disk's partition table.
 #include "tavo_partition.h"
 
 #include "core/detail/log.h"

@@ -1,4 +1,4 @@
-// Tells whether a disk is a member of an array.
+// Checks whether a disk is a member of an array.
 #include "tavo_raid.h"
 
 #include "core/detail/guard.h"

@@ -1,4 +1,4 @@
-// Tells whether an array can use more of its members.
+// Checks whether an array can use more of its members.
 #include "tavo_appliance.h"
 #include "tavo_disk.h"
 #include "tavo_raid.h"
@@ -32,7 +32,7 @@ extern "C" int RAIDExpansible(const RAIDINFO *pInfo, uint64_t *pcKibMember)
     uint64_t kib = sectors / 2;
     if (const unsigned long limit = RAIDSizeLimitGet())
         kib = std::min<uint64_t>(kib, limit);
-    constexpr uint64_t superblock = 1024;  // and what else stands before and behind the data
+    constexpr uint64_t superblock = 1024;  // and the other metadata before and after the data
     kib -= std::min(kib, superblock);
     if (kib <= pInfo->cbMember / 1024)
         return 0;

@@ -1,4 +1,4 @@
-// Gives the stripe size of an array.
+// Computes the stripe size of an array.
 #include "tavo_raid.h"
 
 #include "core/detail/guard.h"

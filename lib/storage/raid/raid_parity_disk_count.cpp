@@ -1,4 +1,4 @@
-// Tells how many disks a level can lose.
+// Returns how many disks a level can lose.
 #include "tavo_raid.h"
 
 #include "core/detail/log.h"

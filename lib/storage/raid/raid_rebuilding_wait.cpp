@@ -15,7 +15,7 @@ constexpr int kPollSeconds = 30;
 constexpr int kMostFailures = 4;
 constexpr int kMostExtraRounds = 6;
 
-// All members are there and the array is degraded all the same: a rebuild is about to start.
+// Returns true when all members are present but the array is degraded: a rebuild is about to start.
 bool IsAboutToRebuild(const RAIDINFO &info)
 {
     return info.nWorking == info.nSlot - info.nFailed && info.nStatus == RAID_STATUS_DEGRADED;

@@ -107,7 +107,7 @@ int64_t PlanPartitions(const char *disk, Replacement &plan)
     return sectors > around ? static_cast<int64_t>(sectors - around) : 0;
 }
 
-// Superblock, bitmap and data need room; how much stands before the data is known from the neighbour.
+// Superblock, bitmap and data need room; another member shows the size of the part before the data.
 bool IsLargeEnough(const RAIDINFO &info, const Replacement &plan, int64_t sectors)
 {
     const std::string name(tavo::WithoutDev(plan.neighbour->szPath));

@@ -1,4 +1,4 @@
-// Gives the size that an array can have.
+// Computes the size to which an array can grow.
 #include "tavo_raid.h"
 
 #include "core/detail/fault.h"

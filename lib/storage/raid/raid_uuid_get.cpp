@@ -1,4 +1,4 @@
-// Gives an array's UUID.
+// Reads an array's UUID.
 #include "tavo_raid.h"
 
 #include "core/detail/guard.h"

@@ -189,8 +189,8 @@ TEST(Bdb, DomainPartGoesStale)
     EXPECT_EQ(LastFault(), (Fault{ERR_KEY_NOT_FOUND, "bdb_domain_expire_time_delete"}));
 }
 
-// What is no store is deleted, never followed, never waited for, and the database says nothing on standard error.
-TEST(Bdb, FilesThatAreNoStore)
+// Files that are not stores are deleted, never followed, never waited for, and the database prints nothing.
+TEST(Bdb, RemovesForeignFiles)
 {
     const test::ScratchDir dir;
     const std::string path = dir / "store";

@@ -1,5 +1,5 @@
-// A program that changes users or groups dies, at every system call. After the next change every file in which an account
-// is named is the old or the new one, all of them alike: also where the first one died over what follows.
+// A program that changes users or groups dies, at every system call. After the next change every file in which an
+// account is named is the old or the new one, all of them alike: also where the first one died over what follows.
 #include "tavo_group.h"
 #include "tavo_user.h"
 
@@ -138,7 +138,7 @@ TEST(AccountDeath, NeighboursThatFailAreTriedAgain)
         SetUsers({{"bob", "robert"}}, "secret");
         EXPECT_EQ(test::FileText("/etc/passwd"), after.at("/etc/passwd"));
         EXPECT_NE(Everything(), after);
-        // Nobody gets the old name, and with it what it may still open.
+        // A new account cannot get the old name, and with it rights that still exist.
         EXPECT_EQ(test::AddUser("bob"), 0) << "of the batch";
         EXPECT_EQ(TLIBErrGet(), ERR_REMOVE_FAILED);
         EXPECT_EQ(test::FileText("/etc/passwd"), after.at("/etc/passwd"));

@@ -42,8 +42,8 @@ Described GroupsInFiles()
     return found;
 }
 
-// Step s of somebody who works with groups: one is added, described, renamed with other members, and deleted two rounds
-// later. What he has then is worked out as he goes.
+// Step s of a program that works with groups: one is added, described, renamed with other members, and deleted two
+// rounds later. The expected groups are computed with each step.
 struct Worker {
     void Step(int s, bool really)
     {

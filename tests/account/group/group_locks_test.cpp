@@ -1,5 +1,5 @@
-// Who changes accounts takes locks in one order, so that nobody waits for somebody who waits for him, and nothing is
-// lost when many do it at once.
+// Changes of accounts take the locks in one order, so that they cannot deadlock, and nothing is lost when many programs
+// make them at once.
 #include "account/group/group_fixture.h"
 #include "support/rounds.h"
 
@@ -104,7 +104,7 @@ TEST(AccountLocks, AreTakenInOneOrder)
             }
             if (step[0] == '+' && !held.contains(name))
                 taken.push_back(step);
-            // What stands behind it in the order must not be held, unless it is held itself already.
+            // Locks after it in the order must not be held, unless it is held itself already.
             bool behind = false;
             for (const char *other : kOrder) {
                 EXPECT_FALSE(behind && held.contains(other) && !held.contains(name))
@@ -200,7 +200,7 @@ TEST(GroupConcurrency, WorkersAddChangeDeleteGroupsAndRenameTheirMembers)
     ASSERT_TRUE(test::GetGroup("root"));
     EXPECT_EQ(Found(test::GroupFile()), groups);
     EXPECT_EQ(Found(test::FileText("/etc/passwd")), users);
-    // Whoever is a member is still there under that name: no rename passed a group by.
+    // Every member still exists under that name: no rename missed a group.
     for (const std::string &name : groups)
         for (const std::string &member : test::Members(*test::GetGroup(name)))
             EXPECT_TRUE(member == "admin" || users.contains(member)) << member << " in " << name;

@@ -218,7 +218,7 @@ TEST(GroupSet, GidsOfTheRange)
         EXPECT_EQ(GetGroup("new")->nGid, row.gid) << row.current;
         EXPECT_THAT(GroupFile(), testing::StartsWith("#$_@GID__INDEX@_$" + std::to_string(row.gid) + "$\n"));
     }
-    // Without its first line the file goes on behind the greatest id.
+    // Without its first line the next id follows the greatest one in the file.
     test::WriteFile("/etc/group", "root:x:0:\na:x:70000:\n");
     ASSERT_EQ(AddGroup("new"), 0);
     EXPECT_EQ(GetGroup("new")->nGid, 70001);

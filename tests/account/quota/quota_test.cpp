@@ -1,4 +1,4 @@
-// Quotas: what the kernel is asked, what the tools are told, and what becomes of their answers.
+// Quotas: the requests to the kernel, the commands, and the handling of their results.
 #include "tavo_quota.h"
 #include "tavo_user.h"
 

@@ -1,5 +1,5 @@
-// A local user without rights: reads nothing that is secret, writes nothing that the library believes, stops nobody, and
-// still can look up what everybody may know.
+// A local user without rights cannot read secrets, write anything that the library trusts, or block other programs, but
+// can look up public facts.
 #include "tavo_bdb.h"
 #include "tavo_group.h"
 #include "tavo_quota.h"
@@ -141,7 +141,7 @@ TEST(StoreTrust, WhatOthersMayWriteIsNeverOpened)
 }
 
 // A tree that takes minutes to walk, at every name that the library uses there.
-TEST(StoreTrust, TreesInTheWayStopNobody)
+TEST(StoreTrust, PlantedTreesBlockNoCall)
 {
     TouchBoth();
     std::vector<std::string> names = AllStores();
@@ -373,7 +373,7 @@ TEST(StoreTrust, LookUpsWithoutRights)
     const std::string answers = PublicAnswers();
     EXPECT_NE(answers.find("alice"), answers.npos);
     EXPECT_EQ(test::AsNobody(PublicAnswers), answers);
-    // Nor do they need the stores, or can be stopped by what becomes of them, or by whoever holds a lock.
+    // They do not need the stores, so neither damaged stores nor held locks stop them.
     for (const std::string &store : AllStores())
         ::unlink(store.c_str());
     EXPECT_EQ(test::AsNobody(PublicAnswers), answers);

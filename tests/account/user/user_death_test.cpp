@@ -148,7 +148,7 @@ TEST(UserDeath, AtRandomMoments)
 }
 
 // Each worker adds, renames and deletes accounts of its own; one more edits the files as the system's tools do, under
-// the system's lock. Whatever a worker was told has happened, has.
+// the system's lock. Every change that a worker saw succeed has happened.
 TEST(UserConcurrency, WorkersAndTheSystemsTools)
 {
     constexpr int workers = 16;

@@ -1,5 +1,5 @@
-// The stores under /tmp are a cache: whatever happens to them, and to the text files behind the library's back, no
-// account is lost and nothing outside is touched.
+// The stores under /tmp are a cache: damage to them, and edits of the text files by other programs, lose no account and
+// change nothing outside.
 #include "tavo_group.h"
 #include "tavo_user.h"
 
@@ -209,8 +209,8 @@ TEST(UserStore, DamageOfEveryKind)
     EXPECT_EQ(test::ReadFile(outside), "precious\n");
 }
 
-// Somebody edits the files, in the same second as we wrote them or with an old time stamp: it is seen all the same.
-TEST(UserStore, EditsBehindTheLibrarysBack)
+// Another program's edits are noticed, even in the same second as our own write or with an old time stamp.
+TEST(UserStore, EditsByOtherPrograms)
 {
     ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
     ExternalEdit("/etc/passwd", "extra:x:1500:100::/home/extra:/bin/sh");
@@ -254,8 +254,8 @@ TEST(UserStore, EditsWhileTheStoresAreBuilt)
     EXPECT_TRUE(GetUser("ext3"));
 }
 
-// Somebody changes the files while a change of ours is under way, without the system's lock: whatever ours does not touch
-// stays as he has written it.
+// Another program edits the files during a change of ours, without the system's lock: accounts that our change does not
+// touch keep its edits.
 TEST(UserStore, EditsWhileOthersAreChanged)
 {
     ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
@@ -283,7 +283,7 @@ TEST(UserStore, EditsWhileOthersAreChanged)
         EXPECT_NE(test::LineOf("/etc/shadow", name), "") << name;
         EXPECT_TRUE(GetUser(name)) << name;
     }
-    // Somebody who never stops is told from one who can be waited for: nothing has changed then.
+    // A program that never stops editing makes the change fail, and nothing has changed.
     const std::function<void()> forever = [&] {
         ExternalEdit("/etc/passwd", "x" + std::to_string(syncs) + ":x:902:100::/:/bin/sh");
         at_sync = forever;

@@ -1,5 +1,5 @@
-// Sixteen programs change accounts at once, each now through the library and now with the system's own useradd, usermod,
-// passwd and userdel. Whatever one of them was told has happened, has, and stays.
+// Sixteen programs change accounts at once, each now through the library and now with the system's own useradd,
+// usermod, passwd and userdel. Every change that one of them saw succeed has happened, and stays.
 #include "tavo_user.h"
 
 #include "account/user/user_fixture.h"
@@ -25,7 +25,7 @@ namespace {
 constexpr int kWorkers = 16;
 constexpr int kSteps = 8;      // of a cycle, one operation each
 constexpr int kCycles = 40;    // 16 x 40 x 8: 5,120 operations
-constexpr int kPatience = 20;  // how often somebody asks again who was told that another one holds the lock
+constexpr int kPatience = 20;  // how often a program tries again when another one holds the lock
 
 constexpr char kAddedHash[] = "$1$ab$cdefghijklmnopqrstuv./";
 

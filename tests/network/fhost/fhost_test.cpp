@@ -222,7 +222,7 @@ TEST_F(Discovery, HostsAreHandedToACallbackAndTheListStays)
     EXPECT_EQ(sent.size(), 2u);
     EXPECT_EQ(ReadFile(kList), list);
 
-    // What an earlier search left is no answer.
+    // A list of an earlier search does not count as an answer.
     const auto past = std::filesystem::file_time_type::clock::now() - std::chrono::minutes(1);
     std::filesystem::last_write_time(kTaken, past);
     heard = {{}, 1};

@@ -162,7 +162,7 @@ TEST_F(Kernel, HasTheNameTheMtuAndTheServers)
     EXPECT_EQ(here_->Output("cat /etc/resolv.conf"), "nameserver\t192.0.2.53\n");
 }
 
-TEST_F(Kernel, SpeaksIPv6AsItWasTold)
+TEST_F(Kernel, TakesIPv6Settings)
 {
     EXPECT_TRUE(here_->Run([] {
         if (!std::filesystem::exists("/proc/net/if_inet6"))

@@ -150,7 +150,7 @@ bool SendsBy(const std::string &card)
     return Sent(card) > before;
 }
 
-TEST_F(MachineBond, ALostCableIsNoLostNetwork)
+TEST_F(MachineBond, SurvivesALostCable)
 {
     for (const int mode : {TAVO_NET_AGGR_BACKUP, TAVO_NET_AGGR_ADAPTIVE}) {
         SCOPED_TRACE(mode);

@@ -186,7 +186,7 @@ TEST_F(Bond, ANetworkThatDoesNotStartIsPutBack)
     EXPECT_EQ(Files(), kPlainFiles);
 }
 
-// Each interface stands alone, or belongs to a bond that has a file; none is half a file.
+// Each interface is on its own, or belongs to a bond that has a file; no file is incomplete.
 void ExpectStartable(const std::string &when)
 {
     for (const char *name : {"eth0", "eth1"}) {

@@ -112,7 +112,7 @@ TEST_F(NetIPv6, RoutesGoToNetworks)
     EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_ipv6_route_del"}));
 }
 
-TEST_F(NetIPv6, WhatIsNoAddressIsRefused)
+TEST_F(NetIPv6, RefusesInvalidAddresses)
 {
     const struct {
         const char *interface, *text;
@@ -175,7 +175,7 @@ TEST_F(NetIPv6, AddressesComeFromTheKernelsTable)
     EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
 }
 
-TEST_F(NetIPv6, ACardIsToldWhatWakesTheAppliance)
+TEST_F(NetIPv6, SetsTheWakeUpPacketsOfACard)
 {
     test::ForgetFault();
     EXPECT_EQ(TAVONetWolGet("eth0"), 0);
@@ -224,7 +224,7 @@ TEST_F(NetIPv6, WhatCannotWakeSaysWhy)
     }
 }
 
-TEST_F(NetIPv6, ThePanelIsToldOnlyOnModelsThatHaveOne)
+TEST_F(NetIPv6, UsesThePanelOnlyOnModelsThatHaveOne)
 {
     tree_.Put("/dev/ttyS1", "");
     EXPECT_EQ(TAVONetWolSet("eth0", 1), 0);

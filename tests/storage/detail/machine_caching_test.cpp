@@ -1,4 +1,4 @@
-// The write cache by SCSI's caching page, on a real drive: the way that disks behind other controllers are asked.
+// The write cache by SCSI's caching page, on a real drive: the way that disks on other controllers are queried.
 #include "storage/detail/caching_page.h"
 #include "storage/detail/raw_disk.h"
 

@@ -1,4 +1,5 @@
-// What the kernel's files, the drives' pages and the partitioning tool say, and what becomes a name in a path or command.
+// What the kernel's files, the drives' pages and the partitioning tool say, and what becomes a name in a path or
+// command.
 #include "storage/detail/ata_pass_through.h"
 #include "storage/detail/boot_sector.h"
 #include "storage/detail/caching_page.h"
@@ -38,7 +39,7 @@ TEST(DeviceName, KeepsWithinItsDirectory)
     EXPECT_EQ(tavo::WithoutNumber("10"), "");
 }
 
-TEST(PartitionsRow, TellsRowsFromOtherLines)
+TEST(PartitionsRow, IgnoresOtherLines)
 {
     std::vector<std::string> names;
     std::string_view text = test::Capture("proc_partitions_md_lvm-linux-6.1-armmp-lpae");
@@ -95,7 +96,7 @@ TEST(DrivePage, ReadsTheTemperature)
         std::initializer_list<unsigned char> raw;
         int degrees;  // -1: not known
     } rows[] = {
-        {{31, 0, 0, 0, 0, 0}, 31},          {{37, 0, 14, 0, 54, 0}, 37},  // lowest and highest packed behind it
+        {{31, 0, 0, 0, 0, 0}, 31},          {{37, 0, 14, 0, 54, 0}, 37},  // lowest and highest packed after it
         {{37, 0, 0x0E, 0, 0x36, 0xFF}, 37}, {{0xF6, 0xFF, 0, 0, 0, 0}, -10}, {{200, 0, 0, 0, 0, 0}, 200},
         {{201, 0, 0, 0, 0, 0}, -1},         {{0, 0x80, 0, 0, 0, 0}, -1},
     };
@@ -197,7 +198,7 @@ TEST(SfdiskLine, TakesFiveWords)
                             "/dev/sda1 -1 1 1 fd", "/dev/sda1 1 1 99999999999999999999 fd", "/dev/sda1 1 1 1 fdx",
                             "/dev/sda1 1 1 1 1ffffffff", "sfdisk: cannot open /dev/sda: No such file"})
         EXPECT_FALSE(tavo::ParseSfdiskLine(bad)) << bad;
-    // What lies behind the first 63 characters does not exist for the reader.
+    // The reader ignores text after the first 63 characters.
     EXPECT_FALSE(tavo::ParseSfdiskLine(std::string(60, 'd') + " 1 2 3 4"));
     EXPECT_FALSE(tavo::ParseSfdiskLine("/dev/sda1 256 4980735 4980480" + std::string(34, ' ') + "fd"));
 }
@@ -225,7 +226,7 @@ TEST(AtaPassThrough, WrapsAndReadsRegisters)
     EXPECT_FALSE(tavo::ParseAtaResult(std::span(fixed).first(8)));
 }
 
-TEST(CachingPage, IsFoundBehindTheBlockDescriptor)
+TEST(CachingPage, IsFoundAfterTheBlockDescriptor)
 {
     std::vector<uint8_t> mode_data(40);
     mode_data[3] = 8;

@@ -41,7 +41,8 @@ std::string Hex(const unsigned char *bytes, size_t count)
     return text;
 }
 
-// A drive behind the kernel's requests: notes each one, answers it, fails those that the test names.
+// Stands in for the drives: records each request of the kernel's interface, answers it, and fails those that the test
+// names.
 class Drives : public testing::Test {
   protected:
     Drives() : calls_([this](int fd, unsigned long request, void *argument) { return Answer(fd, request, argument); })
@@ -400,7 +401,7 @@ TEST_F(Drives, WriteCacheOfAtaDisks)
     EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_RAWDEVICE, "disk_write_cache_set"}));
 }
 
-TEST_F(Drives, WriteCacheOfDisksBehindTheOtherInterface)
+TEST_F(Drives, WriteCacheOfDisksOnTheOtherInterface)
 {
     Add("sdb", 16, true);
     mode_data_ = {23, 0, 0x10, 0, 0x88, 18, 0x04};

@@ -250,7 +250,7 @@ TEST_F(Lvm, RemovesTheVolumeOfOneDeviceAlone)
     EXPECT_EQ(LVMGetLVPath("/dev/md10", path, 14), -1);
 }
 
-TEST_F(Lvm, CleansDisksThatNobodyUses)
+TEST_F(Lvm, CleansUnusedDisks)
 {
     const std::string marker = "/tmp/lvm_test_removed";
     ::unlink(marker.c_str());

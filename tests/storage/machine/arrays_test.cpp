@@ -125,7 +125,7 @@ TEST_F(MachineArrays, ALifeOfSixDisks)
         EXPECT_EQ(RAIDAdd(ReadArray("/dev/md0").get(), member), 0);
     EXPECT_TRUE(BecomesNormal("/dev/md0"));
 
-    // Cleaned by its UUID, this array is gone from its members; nobody else is touched.
+    // Cleaning by its UUID removes this array from its members; other disks are not touched.
     EXPECT_EQ(RAIDSBCleanByUUID(nullptr, uuid.c_str()), 0);
     for (const std::string &member : Partitions(3, 1, 4))
         EXPECT_FALSE(HasSuperblock(member)) << member;

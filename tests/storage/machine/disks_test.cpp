@@ -57,7 +57,7 @@ TEST_F(MachineDisks, AreEnumeratedInTheOrderOfTheirBays)
     DiskInfoEnumFree(list);
 }
 
-TEST_F(MachineDisks, AnEmptyBayIsNoFailure)
+TEST_F(MachineDisks, ReportsAnEmptyBayWithoutFailure)
 {
     test::Happen("pull 3");
     {
@@ -174,7 +174,7 @@ TEST_F(MachineDisks, PowerIsAskedAndChanged)
     EXPECT_EQ(TLIBErrGet(), ERR_OPEN_RAWDEVICE);
 }
 
-TEST_F(MachineDisks, AStickWithoutATableIsTold)
+TEST_F(MachineDisks, RecognisesAStickWithoutATable)
 {
     EXPECT_EQ(TAVOIsUSBDiskFATNoPartition("/dev/sdd"), 0);
     // The first sector of a FAT16 file system.

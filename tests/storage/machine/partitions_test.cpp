@@ -34,7 +34,7 @@ struct Place {
     }
 };
 
-// As it stands on the disk.
+// As it is on the disk.
 std::array<Place, 4> TableOf(const std::string &disk)
 {
     unsigned char sector[512] = {};

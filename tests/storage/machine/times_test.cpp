@@ -33,7 +33,7 @@ double Tell(const char *what, double library, const char *peer, double others)
     return others / library;
 }
 
-// The kernel composes the file anew for every reading, which is most of the work.
+// The kernel composes the file for every reader, which is most of the work.
 TEST_F(MachineTimes, TheListOfPartitionsCostsItsReading)
 {
     Told("truncate -s 1M /tmp/image; for i in $(seq 0 57); do [ -e /dev/loop$i ] || mknod /dev/loop$i b 7 $i; "

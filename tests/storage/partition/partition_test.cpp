@@ -128,7 +128,7 @@ TEST(BlTAVOCheckPartitionLayout, EveryLayoutAndNothingElse)
                 ElementsAre(MatchesRegex("partition_check_layout:[0-9]+ sdb: dont contain partition \\[1\\]")));
 }
 
-TEST(RCPartitionConfigs, GivesWhatTheToolSays)
+TEST(RCPartitionConfigs, ReturnsTheToolsAnswer)
 {
     test::RecordedCommands commands([](const std::string &) -> test::CommandReply {
         return {0, "/dev/sda3 9437184 11721045167 11711607984 fd Linux\nsecond line\n"};

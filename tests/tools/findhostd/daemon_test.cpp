@@ -321,7 +321,7 @@ TEST_F(Daemons, OneEndsWithTheOther)
     }));
 }
 
-// Whoever starts it reads to its end, or has no streams at all.
+// The starting program reads to the end of its output, or has no streams at all.
 TEST_F(Daemons, LeaveTheCallersStreams)
 {
     EXPECT_TRUE(nodes_[0]->Run([] {
@@ -467,7 +467,7 @@ TEST_F(Daemons, HostileRepliesChangeNothing)
     }));
 }
 
-TEST_F(Daemons, NobodyIsFloodedOnSomebodysBehalf)
+TEST_F(Daemons, CannotBeUsedToFloodAnotherHost)
 {
     ASSERT_EQ(nodes_[0]->Shell(kDaemon), 0);
     const std::string query(reinterpret_cast<const char *>(stFHOSTBroadCast), sizeof stFHOSTBroadCast);
@@ -690,7 +690,7 @@ TEST_F(Daemons, ACrowdDoesNotSilenceDiscovery)
     ::waitpid(flooder, nullptr, 0);
 }
 
-// Anybody who may log in may ask, too, as often as he likes.
+// Every local user may ask, too, at any rate.
 TEST_F(Daemons, ALocalQueryEmptiesNoList)
 {
     StartAll();
@@ -711,7 +711,7 @@ TEST_F(Daemons, ALocalQueryEmptiesNoList)
         EXPECT_LE(lists.size(), 30u) << "four a second";
         return true;
     }));
-    // The other two: an answer that comes later in the same collection renames nobody.
+    // The other two: a later answer in the same collection does not rename a host.
     EXPECT_TRUE(nodes_[1]->Run([] {
         UdpSocket().Send("192.0.2.1", Reply("192.0.2.2", "forged"));
         return true;
@@ -729,7 +729,7 @@ TEST_F(Daemons, ALocalQueryEmptiesNoList)
     }));
 }
 
-TEST_F(Daemons, WhatStandsInTheListsPlaceIsReplaced)
+TEST_F(Daemons, ReplaceForeignFilesAtTheListsPath)
 {
     StartAll();
     EXPECT_TRUE(nodes_[0]->Run([] {
@@ -751,7 +751,8 @@ TEST_F(Daemons, WhatStandsInTheListsPlaceIsReplaced)
 
 }  // namespace
 
-// The library's waiting: a tenth of the time between two looks at the list, not for the daemon, which is ready when its start is over, and for answers until they are there.
+// The library's waiting: a tenth of the time between two looks at the list, not for the daemon, which is ready when its
+// start is over, and for answers until they are there.
 extern "C" unsigned sleep(unsigned seconds)
 {
     if (seconds == 1)

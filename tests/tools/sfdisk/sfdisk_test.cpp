@@ -200,7 +200,7 @@ void ExpectSound(const std::string &image)
     }
 }
 
-TEST_F(Sfdisk, GivesLargeDisksAGuidTable)
+TEST_F(Sfdisk, WritesAGuidTableToLargeDisks)
 {
     const struct {
         uint64_t sectors;

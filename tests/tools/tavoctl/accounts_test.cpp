@@ -421,7 +421,7 @@ TEST_F(TavoctlAccounts, ExportedAccountsComeBackAsTheyWere)
         EXPECT_EQ(Fields(shadow, "admin").at(1), "*") << "what has no password does not get one";
         ExpectDone({"group", "delete", "--yes", "staff"});
     }
-    // Without being asked for them nobody gets the hashes.
+    // Hashes are only exported on request.
     EXPECT_THAT(Tavoctl({"user", "export"}).out, AllOf(HasSubstr("anna"), Not(HasSubstr("$1$"))));
     EXPECT_THAT(Tavoctl({"user", "export", "--json"}).out, AllOf(HasSubstr("anna"), Not(HasSubstr("hash"))));
 }

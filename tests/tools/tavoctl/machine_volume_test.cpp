@@ -1,5 +1,5 @@
-// tavoctl storage, volume and the verbs that mend arrays, on real disks: from blank disks to a volume, through a disk that
-// is pulled, and back after everything was stopped.
+// tavoctl storage, volume and the verbs that mend arrays, on real disks: from blank disks to a volume, through a disk
+// that is pulled, and back after everything was stopped.
 #include "run_tavoctl.h"
 
 #include "support/machine.h"
@@ -134,7 +134,7 @@ TEST_F(MachineVolumes, WhatCannotBeStartedSafelyIsSaidAndForcedOnRequest)
 {
     Succeeds({"raid", "create", "--yes", "--level", "5", "--no-sync", "md2", "sda", "sdb", "sdc"});
     Told("dd if=/dev/urandom of=/dev/md2 bs=64k count=16 oflag=direct");
-    // Two of three, one of them behind: it had failed before the last writes.
+    // Two of three, one of them outdated: it had failed before the last writes.
     Told("mdadm -q /dev/md2 --fail /dev/sdc && dd if=/dev/urandom of=/dev/md2 bs=64k count=16 oflag=direct");
     Succeeds({"raid", "stop", "--yes", "md2"});
     test::Happen("pull 2");

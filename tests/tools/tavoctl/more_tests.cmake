@@ -5,7 +5,7 @@ set_source_files_properties(${tavoctl_folder}/storage/smart_pages.cpp PROPERTIES
 target_include_directories(tools_tavoctl_test PRIVATE ${tavoctl_folder})
 target_link_libraries(tools_tavoctl_test PRIVATE crypt)
 
-# The texts that go with tavoctl are for the machine of whoever builds it; the program only prints here.
+# The texts that go with tavoctl are built for the building machine; the program only prints here.
 add_test(NAME tavoctl_texts COMMAND ${folder}/texts $<TARGET_PROPERTY:tavoctl_man_page,MAN_PAGE>
     ${PROJECT_SOURCE_DIR} ${CMAKE_CROSSCOMPILING_EMULATOR} $<TARGET_FILE:tavoctl>)
 set_tests_properties(tavoctl_texts PROPERTIES TIMEOUT 120)

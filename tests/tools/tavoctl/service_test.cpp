@@ -1,4 +1,4 @@
-// tavoctl service: the table, the statuses and what the changing verbs leave behind, on stand-in daemons.
+// tavoctl service: the table, the statuses and the effects of the changing verbs, on stand-in daemons.
 #include "run_tavoctl.h"
 
 #include "support/eventually.h"
@@ -244,7 +244,7 @@ TEST_F(TavoctlService, VolumeBindsTheFoldersAndRestoreFindsThemAgain)
     EXPECT_EQ(LinkTarget("/var/services/web"), "/volume2/web");
 }
 
-TEST_F(TavoctlService, ABusyDispatcherIsToldApart)
+TEST_F(TavoctlService, ReportsABusyDispatcher)
 {
     ASSERT_EQ(ErrTLIBFileLock(TAVO_LOCK_TAVOINFO | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING, 0), 0);
     EXPECT_EQ(Tavoctl({"service", "reload", "crond"}).status, 4);

@@ -28,7 +28,7 @@ using testing::StartsWith;
 constexpr char settings[] = "# ours\nname=\"a nas\"\nmode=one\nmode=two\nempty=\n";
 constexpr char sections[] = "; head\n[a]\nk=1\n# note\nl=2\n[b]\nk=3\n";
 
-// The words with "--file FILE" behind the verb.
+// The words with "--file FILE" after the verb.
 Words In(const std::string &file, Words words)
 {
     words.insert(words.begin() + 2, {"--file", file});
@@ -194,7 +194,7 @@ TEST(TavoctlSettings, JsonSaysWhatWasChanged)
     EXPECT_EQ(Patched(settings, done.at("diff")), ReadFile(path));
 }
 
-TEST(TavoctlSettings, WhoMayNotWriteIsToldSo)
+TEST(TavoctlSettings, ReportsMissingPermission)
 {
     const ScratchDir dir;
     const std::string path = dir / "f";

@@ -16,7 +16,7 @@ namespace {
 using nlohmann::json;
 using test::Shell;
 
-// Runs the watch with its output in a file until it is told to end.
+// Runs the watch with its output in a file until it is stopped.
 class Watching {
   public:
     explicit Watching(const std::string &options = {})
@@ -64,7 +64,7 @@ class Watching {
     int pid_;
 };
 
-TEST(TavoctlWatch, TellsOfMountsServicesLinksAndAddresses)
+TEST(TavoctlWatch, ReportsMountsServicesLinksAndAddresses)
 {
     if (test::RootLacks("mount") || test::RootLacks("net"))
         GTEST_SKIP() << "nothing may be mounted here";

@@ -225,7 +225,7 @@ TEST_F(Net, ShowsWhichPortsAreTaken)
     }));
 }
 
-TEST_F(Net, TellsWhetherAnAddressIsFree)
+TEST_F(Net, ChecksWhetherAnAddressIsFree)
 {
     EXPECT_TRUE(here_->Run([] {
         const Ran used = Tavoctl({"net", "check-address", "192.0.2.99"});
@@ -278,7 +278,7 @@ TEST_F(Net, ATrialThatIsConfirmedStays)
         EXPECT_THAT(ReadFile(kIfcfg), HasSubstr("IPADDR=192.0.2.20\n"));
         EXPECT_EQ(Tavoctl({"net", "confirm"}).status, 3) << "once";
 
-        // The administrator's line is cut off with his address; he comes back by the new one and confirms.
+        // The old address's connection is cut; the administrator reconnects to the new one and confirms.
         std::optional<RunningTavoctl> cut(std::in_place,
                                           test::Words{"net", "set", "--no-probe", "--try", "60", "192.0.2.30/24"});
         EXPECT_TRUE(Eventually([] { return Live().find("192.0.2.30/24") != std::string::npos; }));
@@ -393,7 +393,7 @@ TEST_F(Net, AChangeThatFailsIsNotTried)
         EXPECT_EQ(ran.status, 1);
         EXPECT_THAT(ran.err, HasSubstr("the old settings are back"));
         EXPECT_TRUE(TrialIsOver());
-        // Nor is half of one that nobody tries.
+        // The same for half of a setting that is not on trial.
         const Ran half = Tavoctl({"net", "set", "--no-probe", "192.0.2.20/24", "--gateway", "198.51.100.1"});
         EXPECT_EQ(half.status, 1);
         EXPECT_THAT(half.err, HasSubstr("the old settings are back"));

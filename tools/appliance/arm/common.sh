@@ -3,8 +3,8 @@
 
 arm_tools=$(dirname "$(readlink -f "${BASH_SOURCE[0]}")")
 arm_tree=$(readlink -f "$arm_tools/../../..")
-# Everything that is made lies below one folder, which is safe to delete. Checkouts may share what Debian's packages
-# alone decide; what this tree's own programs go into is never shared.
+# All products are below one folder, which is safe to delete. Checkouts may share products made only of Debian's
+# packages, but not those that contain this tree's own programs.
 arm_own=$arm_tree/build/appliance/arm
 arm_cache=${TAVO_ARM_CACHE:-$arm_own}
 

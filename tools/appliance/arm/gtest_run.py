@@ -55,7 +55,7 @@ class Reader:
             self.current.output = b''
             self.begun += 1
         elif self.current:
-            # What a case prints without an end of line stands before its result.
+            # Output of a case without a final end of line precedes its result.
             end = re.search(_END + re.escape(self.current.name.encode()) + rb'(, where .*)?( \(\d+ ms\))?\r?$', line)
             if end:
                 self.current.output += line[:end.start()]

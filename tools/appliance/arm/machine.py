@@ -371,7 +371,7 @@ class Machine:
         """Runs a program; output(stream, bytes) gets what it writes while it runs, stream is 'out' or 'err'.
 
         tick() is called at least once a second. Options: directory, memory (bytes), fresh (a throw-away copy of the
-        root), layer (a folder in the guest that lies over that copy), host_at (where the share is shown there, too),
+        root), layer (a folder in the guest that is mounted over that copy), host_at (where the share is shown there, too),
         terminal ("rows columns": on the console).
         """
         self.tick = tick

@@ -78,8 +78,8 @@ void LoseArguments()
         std::perror("standin: kernel thread");
 }
 
-// Goes on in a process of its own. The first one ends when that closes its descriptors: who starts a daemon sees its pid
-// file, unless it is a late one.
+// Goes on in a process of its own. The first one ends when that closes its descriptors: who starts a daemon sees its
+// pid file, unless it is a late one.
 void Detach()
 {
     int ready[2];
@@ -102,7 +102,7 @@ void CloseDescriptors()
     ::close_range(3, ~0U, 0);
 }
 
-// Until it is told to end.
+// Logs signals until SIGTERM.
 void LogSignals(const std::string &name, const sigset_t &all, bool stubborn)
 {
     for (;;) {

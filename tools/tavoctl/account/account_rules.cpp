@@ -43,8 +43,8 @@ int LastUserId()
 void WarnOfReusedId(const std::string &name, int uid, int last_before)
 {
     if (uid <= last_before)
-        Warn("the user id " + std::to_string(Id(uid)) + " belonged to a deleted user: files of that user now belong to " +
-             name);
+        Warn("the user id " + std::to_string(Id(uid)) +
+             " belonged to a deleted user: files of that user now belong to " + name);
 }
 
 void RefuseTakenId(const std::string &name, int uid)

@@ -136,7 +136,8 @@ struct Call {
     // as Confirm does.
     bool Proceed(const std::string &question = {}) const;
 
-    // Asks "QUESTION [y/N]" unless --yes was given; throws a Failure when the answer is no or there is no terminal.
+    // Asks "QUESTION [y/N]" unless --yes was given; throws a Failure unless the answer is yes, or when there is no
+    // terminal.
     void Confirm(const std::string &question) const;
 
     void Print(const Table &table) const;

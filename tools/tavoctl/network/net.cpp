@@ -282,8 +282,8 @@ tavoctl net show
 tavoctl net show eth0
 tavoctl net show --json)",
             NetShow);
-    net.Add("set", changes, Answer::Change(), R"(Sets the address of an interface: one from DHCP, or a static one. If you
-reach the appliance by that very interface, say --try: unless the new settings are confirmed in time, here or with
+    net.Add("set", changes, Answer::Change(), R"(Sets the address of an interface: one from DHCP, or a static one. If
+you reach the appliance by that very interface, use --try: unless the new settings are confirmed in time, here or with
 `tavoctl net confirm` from another connection, the old ones come back, also when this command has ended with its
 connection. A static address is taken only when no other host answers for it.
 

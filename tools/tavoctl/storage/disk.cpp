@@ -237,7 +237,7 @@ is given.
 tavoctl disk smart sda
 tavoctl disk smart --wake --json sdb)",
              DiskSmart);
-    disk.Add("health", reads, Answer::List(health_columns), R"(Gives one verdict on each disk, with its reason: good;
+    disk.Add("health", reads, Answer::List(health_columns), R"(Reports one verdict on each disk, with its reason: good;
 worn, which is to be replaced soon (sectors could not be read, or had to be replaced); failing (an attribute has reached
 its threshold, or a self-test failed), with exit status 1. A disk in standby is not read unless --wake is given.
 

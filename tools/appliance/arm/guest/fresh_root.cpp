@@ -42,8 +42,8 @@ void Make(const std::string &directory, mode_t mode = 0755)
     Must(mkdir(directory.c_str(), mode), directory.c_str());
 }
 
-// What the appliance root of a desk has, and no more: a program that is told what its tools answer must not meet the
-// machine's disks.
+// Makes only the devices of the ordinary appliance root: a program with scripted tools must not find the machine's
+// disks.
 void MakePlainDevices(const std::string &dev)
 {
     struct Device {
@@ -86,7 +86,8 @@ void EnterFreshRoot(const std::string &layer, const std::string &host_at)
     const bool real = layer.empty();
     Must(unshare(CLONE_NEWNS | (real ? 0 : CLONE_NEWNET | CLONE_NEWUTS | CLONE_NEWIPC)), "namespaces");
     Must(mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr), "private mounts");
-    // Half of the memory is the limit of a tmpfs: whoever fills the disk meets ENOSPC, not the end of the machine.
+    // A tmpfs is limited to half of the memory: a program that fills the disk gets ENOSPC and does not kill the
+    // machine.
     Must(mount("fresh", place.c_str(), "tmpfs", 0, "mode=755"), "tmpfs");
     for (const char *directory : {"/upper", "/work", "/tavo-upper", "/tavo-work", "/root"})
         Make(place + directory);

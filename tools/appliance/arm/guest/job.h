@@ -15,7 +15,7 @@ struct Job {
     double seconds = 0;    // 0: no limit
     long long memory = 0;  // bytes, 0: no limit
     bool fresh = false;    // in a throw-away copy of the root
-    std::string layer;     // a folder that lies over that copy
+    std::string layer;     // a folder that is mounted over that copy
     std::string host_at;   // where the host's folder is shown, too, in that copy
     std::string terminal;  // on the console, with this size ("rows columns")
 };

@@ -75,7 +75,7 @@ TEST(Outcome, PrintsNoNewline)
     fflush(stdout);
 }
 
-TEST(Outcome, LeavesAProcessBehind)
+TEST(Outcome, LeavesAProcess)
 {
     if (fork() == 0) {
         sleep(1000);

@@ -108,8 +108,8 @@ void MakePlaceFor(const std::string &from, const std::string &to)
     ::close(place);
 }
 
-// Files become hard links where the file system allows it; `skip` is the root itself when it lies below `from`, and
-// the build system's own folders are of no use to anybody inside.
+// Files become hard links where the file system allows it; `skip` is the root itself when it is below `from`, and the
+// build system's own folders, which are not needed inside.
 void LinkTree(const std::string &from, const std::string &to, const std::string &skip)
 {
     struct stat facts;

@@ -33,7 +33,7 @@ struct Entry {
 struct Request {
     std::string root;      // what `build` made: tree/, manifest, mnt/
     std::string emulator;  // static user-mode emulator for programs of another architecture; empty: none
-    std::string cwd;       // where the caller stands
+    std::string cwd;       // the caller's working directory
     std::vector<Entry> entries;
     std::vector<Bind> binds;
     std::vector<std::string> command;

@@ -56,8 +56,8 @@ timespec EndOfStamp()
     return until;
 }
 
-// A hard link shares its bytes with the tree. Programs and libraries are replaced, never edited; whoever edits one all
-// the same is told, and the next build makes the tree anew.
+// A hard link shares its bytes with the tree. Programs and libraries are replaced, never edited. If one has been edited
+// nevertheless, the user is warned and the next build rebuilds the tree.
 std::string EditedFile(const std::string &path, const timespec &since)
 {
     struct stat facts;

@@ -216,7 +216,7 @@ bool AreFewIdsMapped()
     return few;
 }
 
-// Whoever looks for a process by its command line must not find this one, which names them all.
+// A search for a process by its command line must not find this process, whose command line names all of them.
 void LoseArguments(const Request &request)
 {
     std::memset(request.arguments, 0, request.arguments_size);

@@ -11,7 +11,7 @@ std::vector<Entry> ReadManifest(const std::string &root)
     const std::string path = root + "/manifest";
     std::FILE *file = std::fopen(path.c_str(), "re");
     if (!file)
-        Die("%s is no appliance root: make one with tools/appliance/build --out %s", root.c_str(), root.c_str());
+        Die("%s is not an appliance root: make one with tools/appliance/build --out %s", root.c_str(), root.c_str());
     std::vector<Entry> entries;
     char *line = nullptr;
     size_t room = 0;

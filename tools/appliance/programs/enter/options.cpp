@@ -18,7 +18,7 @@ constexpr char usage[] =
     "  --bind SRC[:DST]           SRC is readable inside as DST, an absolute path (default: the same path)\n"
     "  --bind-rw SRC[:DST]        and writable\n"
     "  --emulator FILE            static user-mode emulator for programs of another architecture\n"
-    "  --keep                     leave the private copy behind and say where\n"
+    "  --keep                     keep the private copy and print its path\n"
     "Exit status: the command's, also its death by a signal; 125 the root could not be entered; 126 the command\n"
     "cannot be run; 127 there is no such command.\n";
 
