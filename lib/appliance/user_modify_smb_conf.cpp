@@ -1,6 +1,7 @@
 // Renames and removes users and groups in Samba's settings file.
 #include "tavo_appliance.h"
 
+#include "core/detail/appliance_paths.h"
 #include "core/detail/extras.h"
 #include "core/detail/file_rewrite.h"
 #include "core/detail/guard.h"
@@ -9,8 +10,6 @@
 #include "tavo_str.h"
 
 namespace {
-
-constexpr char kSmbConf[] = "/usr/tavo/etc/smb.conf";
 
 std::optional<std::string> Upper(const std::string &name)
 {
@@ -33,7 +32,7 @@ extern "C" int TAVOUserModifySmbConf(const TLIBSZHASH *pshNames)
         if (!tavo::LoadExtras())  // a name that could not be compared would stay unchanged
             return Fail(ERR_OPEN_FAILED);
         tavo::FileRewrite file;
-        const int open_code = file.Open(kSmbConf);
+        const int open_code = file.Open(tavo::kSambaFile);
         if (file.IsMissing())
             return 0;
         if (open_code != 0)

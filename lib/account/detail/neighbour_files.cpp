@@ -3,14 +3,13 @@
 
 #include "account/detail/ftp_chroot_list.h"
 #include "account/detail/share_groups.h"
+#include "core/detail/appliance_paths.h"
 #include "core/detail/smb_user_lists.h"
 #include "tavo_error.h"
 
 namespace tavo {
 namespace {
 
-constexpr char kSambaSettings[] = "/usr/tavo/etc/smb.conf";
-constexpr char kShareSettingsFile[] = "/usr/tavo/etc/share.conf";
 constexpr char kAfpdConf[] = "/usr/tavo/etc/afpd.conf";
 constexpr std::string_view kGuestModuleName = "uams_guest.so";
 constexpr std::string_view kNoGuestModule = "uams_noguest.so";
@@ -38,7 +37,7 @@ int ChangeText(unsigned target, const char *path, AccountCommit &commit, Change 
 
 int ComposeSambaLists(const NameMap &names, AccountCommit &commit)
 {
-    return ChangeText(kSambaLists, kSambaSettings, commit, [&](std::string_view text) {
+    return ChangeText(kSambaLists, kSambaFile, commit, [&](std::string_view text) {
         return ChangeSmbUserLists(text, [&](std::string_view name, bool is_group) {
             const std::string *found = names.Find(std::string(is_group ? "@" : "").append(name));
             return found ? std::optional(*found) : std::nullopt;
@@ -52,7 +51,7 @@ int ComposeShareLists(const NameMap &names, AccountCommit &commit)
     for (const auto &[key, name] : names.Names())
         if (!hash || TLIBSzHashSetValue(hash.Addr(), key.c_str(), name.c_str()) < 0)
             return ERR_OUT_OF_MEMORY;
-    return ChangeText(kShareLists, kShareSettingsFile, commit,
+    return ChangeText(kShareLists, kShareFile, commit,
                       [&](std::string_view text) { return ChangeShareGroups(text, hash.Get()); });
 }
 

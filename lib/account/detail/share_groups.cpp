@@ -2,6 +2,7 @@
 #include "account/detail/share_groups.h"
 
 #include "account/detail/account_name.h"
+#include "core/detail/appliance_paths.h"
 #include "core/detail/file_rewrite.h"
 #include "core/detail/text_fields.h"
 
@@ -10,17 +11,8 @@
 namespace tavo {
 namespace {
 
-constexpr char kShares[] = "/usr/tavo/etc/share.conf";
 constexpr std::string_view kLists[] = {"readonly", "readwrite", "deny"};
 constexpr std::string_view kBlanks = " \t\r\"";
-
-std::string_view Trimmed(std::string_view text)
-{
-    const size_t begin = text.find_first_not_of(kBlanks);
-    if (begin == text.npos)
-        return {};
-    return text.substr(begin, text.find_last_not_of(kBlanks) - begin + 1);
-}
 
 // The names between the commas; a name that goes takes one comma with it, all others stay as they are spelled.
 std::string ChangeList(std::string_view list, const TLIBSZHASH *names)
@@ -30,7 +22,7 @@ std::string ChangeList(std::string_view list, const TLIBSZHASH *names)
     for (bool more = true; more;) {
         const size_t comma = list.find(',');
         const std::string_view item = list.substr(0, comma);
-        const std::string_view name = Trimmed(item);
+        const std::string_view name = Trimmed(item, kBlanks);
         more = comma != list.npos;
         list.remove_prefix(more ? comma + 1 : list.size());
         const char *value = nullptr;
@@ -55,11 +47,11 @@ std::string ChangeLine(std::string_view line, const TLIBSZHASH *names)
 {
     const size_t equals = line.find('=');
     if (equals == line.npos ||
-        std::find(std::begin(kLists), std::end(kLists), Trimmed(line.substr(0, equals))) == std::end(kLists))
+        std::find(std::begin(kLists), std::end(kLists), Trimmed(line.substr(0, equals), kBlanks)) == std::end(kLists))
         return std::string(line);
     // The quotation marks and blanks around the list are not part of its first and last name.
     const std::string_view value = line.substr(equals + 1);
-    const std::string_view list = Trimmed(value);
+    const std::string_view list = Trimmed(value, kBlanks);
     if (list.empty())
         return std::string(line);
     const size_t at = static_cast<size_t>(list.data() - line.data());
@@ -81,7 +73,7 @@ std::string ChangeShareGroups(std::string_view text, const TLIBSZHASH *names)
 int ChangeGroupsInShares(const TLIBSZHASH *names)
 {
     FileRewrite file;
-    const int code = file.Open(kShares);
+    const int code = file.Open(kShareFile);
     if (code != 0)
         return file.IsMissing() ? 0 : code;
     std::string text;

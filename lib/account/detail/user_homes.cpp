@@ -2,6 +2,7 @@
 #include "account/detail/user_homes.h"
 
 #include "account/detail/account_name.h"
+#include "core/detail/appliance_paths.h"
 #include "core/detail/keep_fault.h"
 #include "core/detail/list_owner.h"
 #include "core/detail/open_file.h"
@@ -18,7 +19,6 @@
 namespace tavo {
 namespace {
 
-constexpr char kShareSettings[] = "/usr/tavo/etc/share.conf";
 constexpr mode_t kHomeMode = 0755;
 
 // A folder's name, never a path: accounts of other systems may be called anything.
@@ -52,7 +52,7 @@ std::string PathOfHomes()
         throw std::bad_alloc();
     tavoerrno = 0;
     errno = ENOENT;
-    if (TLIBFileGetSection(kShareSettings, "homes", pairs.Addr()) < 0) {
+    if (TLIBFileGetSection(kShareFile, "homes", pairs.Addr()) < 0) {
         if (tavoerrno == ERR_OUT_OF_MEMORY)
             throw std::bad_alloc();
         if (tavoerrno == ERR_SECTION_NOT_FOUND)

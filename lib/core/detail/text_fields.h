@@ -16,6 +16,13 @@ inline std::string_view TakeLine(std::string_view &text)
     return line;
 }
 
+// The text without the bytes of `blanks` at both ends.
+inline std::string_view Trimmed(std::string_view text, std::string_view blanks = " \t\r\n")
+{
+    const size_t begin = text.find_first_not_of(blanks);
+    return begin == text.npos ? std::string_view() : text.substr(begin, text.find_last_not_of(blanks) + 1 - begin);
+}
+
 inline std::vector<std::string_view> SplitFields(std::string_view line)
 {
     constexpr std::string_view blanks = " \t\r\n";

@@ -1,6 +1,7 @@
 // A checkpoint of the whole network.
 #include "network/detail/network_checkpoint.h"
 
+#include "core/detail/appliance_paths.h"
 #include "core/detail/file_rewrite.h"
 #include "core/detail/key_value_line.h"
 #include "core/detail/log.h"
@@ -26,7 +27,6 @@ namespace tavo {
 namespace {
 
 constexpr const char *kRecordOfAll = "/etc/network.checkpoint";
-constexpr const char *kSettings = "/etc/tavoinfo.conf";
 // What beside /etc/sysconfig/network, /etc/hosts and /etc/resolv.conf describes the network.
 constexpr const char *kFileStems[] = {"ifcfg-", "more-", "search"};
 constexpr const char *kKeyTails[] = {"_mtu", "_wol_options"};

@@ -1,6 +1,7 @@
 // Carries out what puts a piece of the network back.
 #include "network/detail/undo_action.h"
 
+#include "core/detail/appliance_paths.h"
 #include "core/detail/keep_fault.h"
 #include "core/detail/key_value_line.h"
 #include "core/detail/lock_hold.h"
@@ -23,8 +24,6 @@
 namespace tavo {
 namespace {
 
-constexpr const char *kSystemSettings = "/etc/tavoinfo.conf";
-
 void EndClients(const UndoStep &step)
 {
     for (const Process &process : ListProcesses()) {
@@ -40,7 +39,7 @@ void EndClients(const UndoStep &step)
 
 LockHold LockFor(const UndoStep &step)
 {
-    const bool shared = step.target == kSystemSettings;
+    const bool shared = step.target == kSettings;
     return LockHold(shared ? TAVO_LOCK_TAVOINFO | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING : TAVO_LOCK_EXCLUSIVE, 5);
 }
 

@@ -1,6 +1,7 @@
 // Wake-on-LAN: the limits of the model and its settings, and the configuration of a card.
 #include "network/detail/wake_on_lan.h"
 
+#include "core/detail/appliance_paths.h"
 #include "core/detail/owner.h"
 #include "network/detail/interface_file.h"
 
@@ -48,12 +49,12 @@ bool Ask(const char *interface, ethtool_wolinfo &wake)
 
 bool IsWakeOnLanSupported()
 {
-    return ReadSetting("/etc/tavoinfo.conf", "support_wol") == "yes";
+    return ReadSetting(kSettings, "support_wol") == "yes";
 }
 
 bool IsWokenByPanel()
 {
-    return ReadSetting("/etc.defaults/tavoinfo.conf", "wol_by_panel") == "yes";
+    return ReadSetting(kFactorySettings, "wol_by_panel") == "yes";
 }
 
 std::string WakeOptionsKey(std::string_view interface)

@@ -3,6 +3,7 @@
 
 #include "tavo_file.h"
 
+#include "core/detail/appliance_paths.h"
 #include "core/detail/fault.h"
 #include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
@@ -19,7 +20,7 @@ template <size_t Size>
 bool Read(const char *interface, char (&value)[Size])
 {
     const tavo::KeepFault keep;
-    return TLIBFileGetKeyValue("/etc/tavoinfo.conf", tavo::MtuKey(interface).text, value, Size, 0) > 1;
+    return TLIBFileGetKeyValue(tavo::kSettings, tavo::MtuKey(interface).text, value, Size, 0) > 1;
 }
 
 }  // namespace

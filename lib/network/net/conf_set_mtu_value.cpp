@@ -3,6 +3,7 @@
 
 #include "tavo_file.h"
 
+#include "core/detail/appliance_paths.h"
 #include "core/detail/fault.h"
 #include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
@@ -24,7 +25,7 @@ extern "C" int TAVOConfSetMTUValue(const char *szInterface, int mtu)
     }
     char value[16];
     std::snprintf(value, sizeof value, "%d", mtu);
-    if (TLIBFileSetKeyValue("/etc/tavoinfo.conf", tavo::MtuKey(szInterface).text, value, nullptr) < 0)
+    if (TLIBFileSetKeyValue(tavo::kSettings, tavo::MtuKey(szInterface).text, value, nullptr) < 0)
         return Fail(TLIBErrGet());
     return 0;
 }

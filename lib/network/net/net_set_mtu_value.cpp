@@ -1,6 +1,7 @@
 // Sets the MTU of an interface in the kernel and stores it for the next start.
 #include "tavo_net.h"
 
+#include "core/detail/appliance_paths.h"
 #include "core/detail/guard.h"
 #include "network/detail/checkpoint.h"
 #include "network/detail/interface_name.h"
@@ -14,7 +15,7 @@ int SetBoth(const char *interface, int mtu)
 {
     tavo::Checkpoint before;
     before.AddMtu(interface);
-    before.AddSetting("/etc/tavoinfo.conf", tavo::MtuKey(interface).text);
+    before.AddSetting(tavo::kSettings, tavo::MtuKey(interface).text);
     before.Begin();
     // Also when the command failed: it may have been killed when its work was done.
     if (TAVONetSetMTUEth(interface, mtu) != 0 || TAVOConfSetMTUValue(interface, mtu) != 0) {

@@ -1,6 +1,7 @@
 // Checks whether an interface wakes the appliance.
 #include "tavo_net.h"
 
+#include "core/detail/appliance_paths.h"
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "network/detail/interface_file.h"
@@ -18,7 +19,7 @@ extern "C" int TAVONetWolGet(const char *szInterface)
         }
         // The panel's controller cannot be queried, so the last setting is stored.
         if (tavo::IsWokenByPanel()) {
-            const std::string told = tavo::ReadSetting("/etc/tavoinfo.conf", tavo::WakeOptionsKey(szInterface).c_str());
+            const std::string told = tavo::ReadSetting(tavo::kSettings, tavo::WakeOptionsKey(szInterface).c_str());
             return tavo::ParseWakeOptions(told).value_or(0) != 0 ? 1 : 0;
         }
         const auto wake = tavo::GetWakeSettings(szInterface);

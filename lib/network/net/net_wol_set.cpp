@@ -3,6 +3,7 @@
 
 #include "tavo_file.h"
 
+#include "core/detail/appliance_paths.h"
 #include "core/detail/guard.h"
 #include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
@@ -14,7 +15,6 @@
 
 namespace {
 
-constexpr const char *kSettings = "/etc/tavoinfo.conf";
 constexpr const char *kPanel = "/dev/ttyS1";
 
 // Written as `echo "l"` does, but never made this process's terminal. 0 or a code. Other programs talk to the panel, too,
@@ -36,7 +36,7 @@ int Store(const char *interface, const std::string &options)
         LogError("%s (%d) Failed to lock tavoinfo(%X)", TLIBErrGet());
         return ERR_LOCK_FAILED;
     }
-    return TLIBFileSetKeyValue(kSettings, tavo::WakeOptionsKey(interface).c_str(), options.c_str(), nullptr) < 0
+    return TLIBFileSetKeyValue(tavo::kSettings, tavo::WakeOptionsKey(interface).c_str(), options.c_str(), nullptr) < 0
                ? TLIBErrGet()
                : ERR_SUCCESS;
 }
@@ -68,7 +68,7 @@ extern "C" int TAVONetWolSet(const char *szInterface, int fEnable)
             LogError("%s:%d Wake-on-lan isn't supported.");
             return Fail(ERR_OP_UNREGISTERED);
         }
-        const std::string options = fEnable ? tavo::ReadSetting(kSettings, "wol_enabled_options") : "d";
+        const std::string options = fEnable ? tavo::ReadSetting(tavo::kSettings, "wol_enabled_options") : "d";
         const auto bits = tavo::ParseWakeOptions(options);
         if (!bits) {
             LogError("%s:%d Miss wake-on-lan enable options.");

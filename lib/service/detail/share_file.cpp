@@ -5,6 +5,7 @@
 #include "tavo_hash.h"
 #include "tavo_section.h"
 
+#include "core/detail/appliance_paths.h"
 #include "core/detail/keep_fault.h"
 #include "core/detail/list_owner.h"
 #include "core/detail/lock_hold.h"
@@ -16,7 +17,6 @@
 namespace tavo {
 namespace {
 
-constexpr const char *kShares = "/usr/tavo/etc/share.conf";
 // Samba's lock, because its configuration is made from the shares.
 constexpr unsigned kSharesLock = TAVO_LOCK_SMB | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING;
 constexpr int kLockSeconds = 5;
@@ -28,10 +28,10 @@ Code ReadShare(const char *name, HashOwner &share)
     if (!share)
         return ERR_OUT_OF_MEMORY;
     const KeepFault keep;  // the caller reports the code
-    if (TLIBFileGetSection(kShares, name, share.Addr()) >= 0)
+    if (TLIBFileGetSection(kShareFile, name, share.Addr()) >= 0)
         return 0;
     const int code = TLIBErrGet();
-    return ::access(kShares, F_OK) != 0 && errno == ENOENT ? 0 : code;  // nothing has been recorded yet
+    return ::access(kShareFile, F_OK) != 0 && errno == ENOENT ? 0 : code;  // nothing has been recorded yet
 }
 
 }  // namespace
@@ -51,7 +51,7 @@ Code RecordShare(const char *name, const std::string &path)
     HashOwner share;
     if (!lock)
         return TLIBErrGet();
-    if (TLIBFileTouch(kShares) != 0)
+    if (TLIBFileTouch(kShareFile) != 0)
         return TLIBErrGet();
     if (const Code code = ReadShare(name, share))
         return code;
@@ -59,8 +59,8 @@ Code RecordShare(const char *name, const std::string &path)
         return ERR_OUT_OF_MEMORY;
     // A share that is not recorded yet is not a failure, so the caller must not see that code.
     const KeepFault keep;
-    const int found = ErrTLIBFileSetSection(kShares, name, nullptr, share.Get(), 1, nullptr);
-    if (found < 0 || (found == 0 && ErrTLIBFileAddSection(kShares, name, share.Get(), nullptr) < 0))
+    const int found = ErrTLIBFileSetSection(kShareFile, name, nullptr, share.Get(), 1, nullptr);
+    if (found < 0 || (found == 0 && ErrTLIBFileAddSection(kShareFile, name, share.Get(), nullptr) < 0))
         return TLIBErrGet();
     return 0;
 }
@@ -73,7 +73,7 @@ Code ForgetShare(const char *name)
     Result<std::string> path = SharePath(name);
     if (!path || path->empty())
         return path.Failure();
-    return ErrTLIBFileRemoveSection(kShares, name) < 0 ? TLIBErrGet() : 0;
+    return ErrTLIBFileRemoveSection(kShareFile, name) < 0 ? TLIBErrGet() : 0;
 }
 
 }  // namespace tavo

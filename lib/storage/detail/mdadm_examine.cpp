@@ -2,6 +2,7 @@
 #include "storage/detail/mdadm_examine.h"
 
 #include "core/detail/strict_number.h"
+#include "core/detail/text_fields.h"
 #include "storage/detail/array_level.h"
 #include "storage/detail/array_name.h"
 #include "storage/detail/bounded_text.h"
@@ -13,16 +14,6 @@
 
 namespace tavo {
 namespace {
-
-constexpr std::string_view kBlanks = " \t\r\n";
-
-std::string_view Trimmed(std::string_view text)
-{
-    const size_t begin = text.find_first_not_of(kBlanks);
-    if (begin == text.npos)
-        return {};
-    return text.substr(begin, text.find_last_not_of(kBlanks) + 1 - begin);
-}
 
 // Returns the text before a remark in brackets: "naslab:0  (local to host naslab)".
 std::string_view WithoutRemark(std::string_view value)
