@@ -1,6 +1,7 @@
 """What the modules share: calls that turn failures into exceptions, and the conversion of texts."""
 from __future__ import annotations
 
+import os
 import threading
 from typing import Any, Callable, Iterable, TypeVar
 
@@ -10,7 +11,9 @@ from ._tavosdk import ffi, lib
 Function = TypeVar("Function", bound=Callable[..., Any])
 
 # The library records one failure for the whole process; the interpreter lets other threads run during a call.
-_one_call = threading.RLock()
+one_call = threading.RLock()
+# A child process of fork has none of the other threads: none of them may be in the library just then.
+os.register_at_fork(before=one_call.acquire, after_in_parent=one_call.release, after_in_child=one_call.release)
 
 _NOT_FOUND = {"ERR_KEY_NOT_FOUND", "ERR_SECTION_NOT_FOUND", "ERR_NO_SUCH_USER", "ERR_NO_SUCH_GROUP", "ERR_NO_SUCH_SHARE",
               "ERR_FILE_NOT_FOUND", "ERR_PATH_NOT_FOUND"}
@@ -41,15 +44,15 @@ class LockError(Error):
 
 def failure(what: str) -> Error:
     """The failure that the library recorded last; call it under the lock of `call`."""
-    code = lib.tavoerrno
+    code, module, line = lib.tavoerrno, lib.TAVOErrorGetFile(), lib.TAVOErrorGetLine()
     name = _CODES.get(code, "")
     kind = NotFoundError if name in _NOT_FOUND else LockError if name == "ERR_LOCK_FAILED" else Error
-    return kind(what, code, string(lib.TAVOErrorGetFile()), lib.TAVOErrorGetLine())
+    return kind(what, code, string(module), line)
 
 
 def call(name: str, *arguments: Any, fails: Callable[[Any], bool] | None = None) -> Any:
     """Calls the function and raises Error when it fails: when it returns a negative number or NULL, or as `fails` says."""
-    with _one_call:
+    with one_call:
         lib.TLIBErrSet(0)
         result = getattr(lib, name)(*[to_c(argument) for argument in arguments])
         if fails is None:
@@ -66,9 +69,15 @@ def below_one(result: int) -> bool:
     return result <= 0
 
 
+def ask(name: str, *arguments: Any) -> Any:
+    """The result of a function that cannot fail, or whose result says all."""
+    with one_call:
+        return getattr(lib, name)(*[to_c(argument) for argument in arguments])
+
+
 def quietly(name: str, *arguments: Any) -> tuple[Any, Error | None]:
     """The result of a function and what it recorded, without judging either."""
-    with _one_call:
+    with one_call:
         lib.TLIBErrSet(0)
         result = getattr(lib, name)(*[to_c(argument) for argument in arguments])
         return result, failure(name) if lib.tavoerrno else None
@@ -133,11 +142,11 @@ class CFunction:
     """A function under its C name. Texts may be str, None is NULL; it returns what C returns and raises nothing."""
 
     def __init__(self, name: str):
-        self.__name__, self._function = name, getattr(lib, name)
+        self.__name__ = name
         self.__doc__ = f"{NAMES[name][2]};\n\n{NAMES[name][3]}"
 
     def __call__(self, *arguments: Any) -> Any:
-        return self._function(*[to_c(argument) for argument in arguments])
+        return ask(self.__name__, *arguments)
 
     def __repr__(self) -> str:
         return f"<C function {NAMES[self.__name__][2]}>"

@@ -5,14 +5,14 @@ import contextlib
 from collections.abc import Iterator
 from typing import Any, TypeVar
 
-from ._core import call, ffi, lib
+from ._core import call, ffi, lib, one_call
 
 Owner = TypeVar("Owner", bound="Block")
 
 
 class Block:
     """A block of the library's memory, freed when this object is closed or dies. `cell` is for functions that may move the
-    block, `pointer` for the others."""
+    block, `pointer` for the others: use it under the lock of calls, so that no other thread moves or closes it."""
 
     _allocates, _frees, _type = "", "", ""
 
@@ -34,11 +34,14 @@ class Block:
         return self.cell
 
     def close(self) -> None:
+        with one_call:
+            self.__del__()
+
+    # Nobody else uses an object that dies, and a thread that ends with the interpreter may never release the lock.
+    def __del__(self) -> None:
         if self.open:
             getattr(lib, self._frees)(self.cell[0])
             self.cell[0] = ffi.NULL
-
-    __del__ = close
 
     def __enter__(self: Owner) -> Owner:
         return self

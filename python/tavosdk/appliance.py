@@ -3,7 +3,7 @@ from __future__ import annotations
 
 import dataclasses
 
-from ._core import c_names, call, lib, text, wraps
+from ._core import ask, c_names, call, text, wraps
 from ._owned import record
 
 __getattr__, __dir__ = c_names("appliance", globals())
@@ -19,7 +19,7 @@ class ExpansionUnit:
 
 @wraps("TAVOMaxDiskGet")
 def bays() -> int:
-    return lib.TAVOMaxDiskGet()
+    return ask("TAVOMaxDiskGet")
 
 
 @wraps("TAVOEBoxInfoEnum")

@@ -3,8 +3,9 @@ from __future__ import annotations
 
 import dataclasses
 import enum
+from typing import Any
 
-from ._core import NotFoundError, c_names, call, ffi, lib, text, wraps
+from ._core import Error, NotFoundError, c_names, call, lib, text, to_c, wraps
 from ._owned import chain, record
 
 __getattr__, __dir__ = c_names("raid", globals())
@@ -51,7 +52,7 @@ class Array:
     members: list[Member]
 
 
-def _from_c(info: ffi.CData) -> Array:
+def _from_c(info: Any) -> Array:
     return Array(text(info.szPath), Level(info.fLevel), Status(info.nStatus), bool(info.fRebuilding), info.cbArray,
                  info.nSlot, info.nWorking, info.nFailed,
                  [Member(text(member.szPath), State(member.nState)) for member in chain(info.pMembers)])
@@ -75,5 +76,6 @@ def all() -> list[Array]:
 
 @wraps("RAIDRebuildingWait")
 def wait(path: str) -> None:
-    """Waits until the array is no longer being rebuilt; Error when it is not normal then."""
-    call("RAIDRebuildingWait", path)
+    """Waits until the array is no longer being rebuilt; Error when it is not normal then. Other threads go on."""
+    if lib.RAIDRebuildingWait(to_c(path)) < 0:
+        raise Error(f"{path} is not normal")

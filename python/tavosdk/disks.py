@@ -2,6 +2,7 @@
 from __future__ import annotations
 
 import dataclasses
+from typing import Any
 
 from ._core import NotFoundError, c_names, call, ffi, lib, text, wraps
 from ._owned import chain, record
@@ -19,7 +20,7 @@ class Disk:
     unit: int                 #: the expansion unit, 0 for an internal bay
 
 
-def _from_c(info: ffi.CData) -> Disk:
+def _from_c(info: Any) -> Disk:
     return Disk(text(info.szPath), text(info.szModel).rstrip(), info.cbDisk,
                 None if info.nTemperature < 0 else info.nTemperature, info.iDisk, info.iUnit)
 

@@ -3,7 +3,7 @@ from __future__ import annotations
 
 import dataclasses
 
-from ._core import Error, Texts, c_names, call, lib, quietly, string, text, text_of, to_c, wraps
+from ._core import Error, Texts, ask, c_names, call, lib, quietly, string, text, text_of, wraps
 from ._owned import record
 from .lists import taken
 
@@ -77,7 +77,7 @@ def delete(*names: str) -> None:
 
 @wraps("BlTLIBIsGroupName")
 def is_name(name: str) -> bool:
-    return bool(lib.BlTLIBIsGroupName(to_c(name)))
+    return bool(ask("BlTLIBIsGroupName", name))
 
 
 def exists(name: str) -> bool:

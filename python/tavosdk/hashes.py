@@ -4,7 +4,7 @@ from __future__ import annotations
 from collections.abc import Iterator, Mapping, MutableMapping
 from typing import Any
 
-from ._core import c_names, call, lib, string, to_c
+from ._core import ask, c_names, call, one_call, string
 from ._owned import Block, filled
 from .lists import StringList
 
@@ -22,7 +22,8 @@ class StringHash(Block, MutableMapping[str, str]):
         self.update(pairs or {})
 
     def __getitem__(self, key: str) -> str:
-        value = string(lib.SzTLIBSzHashGetValue(self.pointer, to_c(key)))
+        with one_call:
+            value = string(ask("SzTLIBSzHashGetValue", self.pointer, key))
         if value is None:
             raise KeyError(key)
         return value
@@ -31,14 +32,16 @@ class StringHash(Block, MutableMapping[str, str]):
         call("TLIBSzHashSetValue", self.open_cell, key, value)
 
     def __delitem__(self, key: str) -> None:
-        self[key]
-        lib.SzTLIBSzHashRemoveKey(self.pointer, to_c(key))
+        with one_call:
+            self[key]
+            ask("SzTLIBSzHashRemoveKey", self.pointer, key)
 
     def __len__(self) -> int:
-        return self.pointer.nPair if self.open else 0
+        with one_call:
+            return self.pointer.nPair if self.open else 0
 
     def __iter__(self) -> Iterator[str]:
-        with StringList() as keys:
+        with one_call, StringList() as keys:
             call("TLIBSzHashEnumKey", self.pointer, keys.cell)
             return iter(list(keys))
 

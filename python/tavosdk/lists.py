@@ -4,7 +4,7 @@ from __future__ import annotations
 from collections.abc import Iterable, Iterator, MutableSequence
 from typing import Any
 
-from ._core import c_names, call, lib, quietly, text, wraps
+from ._core import c_names, call, lib, one_call, quietly, text, wraps
 from ._owned import Block, filled
 
 __all__ = ["StringList"]
@@ -22,7 +22,8 @@ class StringList(Block, MutableSequence[str]):
         self.extend(items)
 
     def __len__(self) -> int:
-        return self.pointer.nItem if self.open else 0
+        with one_call:
+            return self.pointer.nItem if self.open else 0
 
     def _index(self, index: int) -> int:
         place = index + len(self) if index < 0 else index
@@ -33,13 +34,17 @@ class StringList(Block, MutableSequence[str]):
     def __getitem__(self, index: Any) -> Any:
         if isinstance(index, slice):
             return [self[place] for place in range(*index.indices(len(self)))]
-        return text(lib.SzTLIBSzListGet(self.pointer, self._index(index)))
+        with one_call:
+            place = self._index(index)
+            return text(lib.SzTLIBSzListGet(self.pointer, place))
 
     def __setitem__(self, index: Any, value: Any) -> None:
         call("TLIBSzListSet", self.open_cell, self._index(index), value)
 
     def __delitem__(self, index: Any) -> None:
-        lib.SzTLIBSzListRemove(self.pointer, self._index(index))
+        with one_call:
+            place = self._index(index)
+            lib.SzTLIBSzListRemove(self.pointer, place)
 
     @wraps("TLIBSzListInsert")
     def insert(self, index: int, value: str) -> None:
@@ -50,13 +55,15 @@ class StringList(Block, MutableSequence[str]):
 
     @wraps("TLIBSzListSortItems")
     def sort(self, ignore_case: bool = False) -> None:
-        lib.TLIBSzListSortItems(self.pointer, lib.TLIB_SZLIST_CASESORTED if ignore_case else lib.TLIB_SZLIST_SORTED)
+        with one_call:
+            lib.TLIBSzListSortItems(self.pointer, lib.TLIB_SZLIST_CASESORTED if ignore_case else lib.TLIB_SZLIST_SORTED)
 
     @wraps("TLIBSzListFind", "TLIBSzListCaseFind")
     def find(self, value: str, ignore_case: bool = False) -> int:
         """The index of the text, -1 without one."""
         function = "TLIBSzListCaseFind" if ignore_case else "TLIBSzListFind"
-        found, error = quietly(function, self.pointer, value)
+        with one_call:
+            found, error = quietly(function, self.pointer, value)
         if error:
             raise error
         return found
@@ -66,8 +73,12 @@ class StringList(Block, MutableSequence[str]):
 
     def __iter__(self) -> Iterator[str]:
         place = 0
-        while place < len(self):
-            yield self[place]
+        while True:
+            try:
+                item = self[place]
+            except IndexError:
+                return
+            yield item
             place += 1
 
     def __eq__(self, other: object) -> bool:
@@ -81,4 +92,5 @@ def taken(function: str, *arguments: Any, place: int | None = None) -> list[str]
     """The texts that a function appends to a list; `place` is where it takes the list among its arguments."""
     with StringList() as into:
         filled(into, function, arguments, place)
-        return list(into)
+        items = into.pointer.pszItem
+        return [text(items[index]) for index in range(len(into))]

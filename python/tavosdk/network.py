@@ -2,8 +2,9 @@
 from __future__ import annotations
 
 import dataclasses
+from typing import Any
 
-from ._core import c_names, call, ffi, lib, text, text_of, to_c, wraps
+from ._core import ask, c_names, call, ffi, lib, text, text_of, to_c, wraps
 from .lists import StringList, taken
 
 __getattr__, __dir__ = c_names("net", globals())
@@ -12,22 +13,61 @@ __getattr__, __dir__ = c_names("net", globals())
 @dataclasses.dataclass
 class Card:
     interface: str
-    dhcp: bool
-    address: str
-    mask: str
-    gateway: str
-    mac: str
-    mtu: int
-    link: bool   #: the cable has something at its other end
+    dhcp: bool = True
+    address: str = ""
+    mask: str = ""
+    gateway: str = ""
+    mac: str = ""
+    mtu: int = 0
+    link: bool = False   #: the cable has something at its other end
+
+
+def _read(function: str, *before: str) -> Any:
+    record = ffi.new("TAVONETCARD *")
+    call(function, *before, record)
+    return record
+
+
+def _from_c(record: Any) -> Card:
+    return Card(text(record.szInterface), record.nMode == lib.TAVO_NET_DHCP, text(record.szIp), text(record.szMask),
+                text(record.szGateway), text(record.szMac), record.nMtu, bool(record.fLink))
 
 
 @wraps("TAVONetGetCard1")
 def first_card() -> Card:
     """The first wired interface."""
-    record = ffi.new("TAVONETCARD *")
-    call("TAVONetGetCard1", record)
-    return Card(text(record.szInterface), record.nMode == lib.TAVO_NET_DHCP, text(record.szIp), text(record.szMask),
-                text(record.szGateway), text(record.szMac), record.nMtu, bool(record.fLink))
+    return _from_c(_read("TAVONetGetCard1"))
+
+
+@wraps("TAVONetGetCard")
+def card(interface: str) -> Card:
+    return _from_c(_read("TAVONetGetCard", interface))
+
+
+@wraps("TAVONetSetCard1")
+def set_card(wanted: Card) -> Card:
+    """Gives an interface its address, by DHCP or a static one, and returns it as it is then. The MTU has a function of
+    its own."""
+    previous = _read("TAVONetGetCard", wanted.interface)
+    record = ffi.new("TAVONETCARD *", previous[0])
+    record.nMode = lib.TAVO_NET_DHCP if wanted.dhcp else lib.TAVO_NET_STATIC
+    addresses = wanted.address, wanted.mask, wanted.gateway
+    record.szIp, record.szMask, record.szGateway = (_short(address) for address in addresses)
+    call("TAVONetSetCard1", record, previous)
+    return card(wanted.interface)
+
+
+def _short(address: str) -> bytes:
+    value: bytes = to_c(address)
+    if len(value) >= 20:
+        raise ValueError(f"not an address: {address}")
+    return value
+
+
+@wraps("TAVONetSetMTUValue")
+def set_mtu(interface: str, size: int) -> None:
+    """Sets the size of the interface's packets, 68 to 65535 bytes, now and for the next start."""
+    call("TAVONetSetMTUValue", interface, size)
 
 
 @wraps("TAVONetDNSGet")
@@ -82,14 +122,14 @@ def _converted(function: str, value: str) -> str:
 @wraps("BlTLIBIsIpAddr")
 def is_address(value: str) -> bool:
     """Whether a host can have this IPv4 address."""
-    return bool(lib.BlTLIBIsIpAddr(to_c(value)))
+    return bool(ask("BlTLIBIsIpAddr", value))
 
 
 @wraps("BlTLIBIsHostname")
 def is_host_name(value: str) -> bool:
-    return bool(lib.BlTLIBIsHostname(to_c(value)))
+    return bool(ask("BlTLIBIsHostname", value))
 
 
 @wraps("BlTLIBIsMailbox")
 def is_mailbox(value: str) -> bool:
-    return bool(lib.BlTLIBIsMailbox(to_c(value)))
+    return bool(ask("BlTLIBIsMailbox", value))

@@ -1,7 +1,7 @@
 """Programs and processes."""
 from __future__ import annotations
 
-from ._core import c_names, call, ffi, lib, to_c, wraps
+from ._core import ask, c_names, call, ffi, to_c, wraps
 from .settings import Path
 
 __getattr__, __dir__ = c_names("proc", globals())
@@ -29,7 +29,7 @@ def find(pattern: str) -> list[int]:
 
 @wraps("BlTLIBProcAlive")
 def alive(pid: int) -> bool:
-    return bool(lib.BlTLIBProcAlive(pid))
+    return bool(ask("BlTLIBProcAlive", pid))
 
 
 @wraps("TLIBReadPidFile")

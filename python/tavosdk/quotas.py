@@ -3,7 +3,7 @@ from __future__ import annotations
 
 import dataclasses
 
-from ._core import c_names, call, ffi, lib, wraps
+from ._core import ask, c_names, call, ffi, wraps
 
 __getattr__, __dir__ = c_names("quota", globals())
 
@@ -16,7 +16,7 @@ class Quota:
 
 @wraps("TAVOSupportQUOTA")
 def supported() -> bool:
-    return bool(lib.TAVOSupportQUOTA())
+    return bool(ask("TAVOSupportQUOTA"))
 
 
 @wraps("TAVOQuotaGet")

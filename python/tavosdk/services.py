@@ -4,7 +4,7 @@ from __future__ import annotations
 import dataclasses
 import enum
 
-from ._core import NotFoundError, c_names, call, lib, string, text, to_c, wraps
+from ._core import NotFoundError, ask, c_names, call, lib, string, text, wraps
 from .lists import taken
 
 __getattr__, __dir__ = c_names("service", globals())
@@ -42,6 +42,12 @@ class Service:
     def disable(self) -> None:
         self.act(Action.DISABLE)
 
+    def start(self) -> None:
+        self.act(Action.START)
+
+    def stop(self) -> None:
+        self.act(Action.STOP)
+
     def restart(self) -> None:
         self.act(Action.RESTART)
 
@@ -49,7 +55,7 @@ class Service:
 @wraps("TAVOServiceIndexGet", "TAVOServiceInfoGet")
 def get(name: str) -> Service:
     """The service of exactly this name; NotFoundError when there is none."""
-    place = lib.TAVOServiceIndexGet(to_c(name))
+    place = ask("TAVOServiceIndexGet", name)
     if place < 0:
         raise NotFoundError(f"no service {name}", lib.ERR_KEY_NOT_FOUND)
     row = call("TAVOServiceInfoGet", place)

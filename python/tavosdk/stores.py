@@ -61,7 +61,7 @@ class Store:
 
     @wraps("TAVOBDbCursorGet")
     def items(self) -> Iterator[tuple[bytes, bytes]]:
-        """All pairs in the order of their keys. Do not store or delete meanwhile."""
+        """All pairs in the order of their keys. A store has one cursor: one walk at a time, and no changes meanwhile."""
         call("TAVOBDbCursorSetType", self.handle, lib.TAVO_BDB_CURSOR_FIRST)
         while True:
             key, value = ffi.new("void **"), ffi.new("void **")

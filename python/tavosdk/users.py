@@ -1,10 +1,13 @@
 """Local user accounts. Changing needs root; the functions take the locks that they need."""
 from __future__ import annotations
 
+import contextlib
 import dataclasses
 import datetime
+from collections.abc import Iterable
+from typing import Any
 
-from ._core import Error, Texts, c_names, call, ffi, lib, quietly, text, to_c, wraps
+from ._core import Error, Texts, ask, c_names, call, ffi, lib, quietly, text, wraps
 from ._owned import record
 from .lists import taken
 
@@ -30,14 +33,14 @@ class User:
 
     @property
     def expired(self) -> bool:
-        return bool(lib.TAVOUserIsExpired(_days(self.expires)))
+        return bool(ask("TAVOUserIsExpired", _days(self.expires)))
 
 
 def _days(day: datetime.date | None) -> int:
     return -1 if day is None else (day - _EPOCH).days
 
 
-def _from_c(user: ffi.CData) -> User:
+def _from_c(user: Any) -> User:
     return User(text(user.szName), user.nUid, user.nGid, text(user.szDesc), text(user.szHome), text(user.szShell),
                 text(user.szMail), None if user.nExpired < 0 else _EPOCH + datetime.timedelta(user.nExpired),
                 not user.fCannotChgPasswd, user.nPrivilege, text(user.szPasswd), user.nKind == lib.TAVO_USER_KIND_DOMAIN)
@@ -73,10 +76,14 @@ def all() -> list[User]:
     return [get(name) for name in names()]
 
 
+def _fill(cell: Any, user: User, password: str) -> None:
+    call("TAVOUserAlloc", cell, user.name, password, user.uid, user.gid, user.description, user.home, user.shell,
+         _days(user.expires), not user.may_change_password, user.mail, user.privilege)
+
+
 def _set(old: str | None, user: User, password: str) -> None:
     with record("TAVOUSER", "TAVOUserFree") as cell:
-        call("TAVOUserAlloc", cell, user.name, password, user.uid, user.gid, user.description, user.home, user.shell,
-             _days(user.expires), not user.may_change_password, user.mail, user.privilege)
+        _fill(cell, user, password)
         # The library skips an entry that it refuses, returns 0, and leaves the code.
         result, error = quietly("TAVOUserSetOne", old, cell[0])
         if error is not None and (result < 0 or error.name in _REFUSED):
@@ -92,6 +99,23 @@ def add(user: User, password: str) -> User:
     """Adds the account and returns it as it is stored."""
     _set(None, user, password)
     return get(user.name)
+
+
+@wraps("TAVOUserSet")
+def add_many(accounts: Iterable[tuple[User, str]]) -> list[User]:
+    """Adds accounts with their passwords in one batch, which takes the locks and rewrites the files once. Returns the added
+    ones as they are stored: the library skips an entry that it refuses, and the system log says why."""
+    with contextlib.ExitStack() as records:
+        cells: list[Any] = []
+        new: dict[str, None] = {}
+        for user, password in accounts:
+            cells.append(records.enter_context(record("TAVOUSER", "TAVOUserFree")))
+            _fill(cells[-1], user, password)
+            if not exists(user.name):
+                new[user.name] = None
+        old_names, users = ffi.new("char *[]", len(cells)), ffi.new("TAVOUSER *[]", [cell[0] for cell in cells])
+        call("TAVOUserSet", old_names, users, len(cells))
+    return [get(name) for name in new if exists(name)]
 
 
 @wraps("TAVOUserSetOne")
@@ -110,9 +134,26 @@ def delete(*names: str) -> None:
         raise error
 
 
+@wraps("TAVOUserLockSet")
+def lock(name: str) -> None:
+    """Lets no password fit any more, for logins and for Samba, until `unlock`. Open sessions stay."""
+    call("TAVOUserLockSet", name, 1)
+
+
+@wraps("TAVOUserLockSet")
+def unlock(name: str) -> None:
+    call("TAVOUserLockSet", name, 0)
+
+
+@wraps("TAVOUserAgingSet")
+def set_password_age(name: str, minimum: int = -1, maximum: int = -1, warning: int = -1) -> None:
+    """Sets how many days a password must be kept, may be used, and is warned about before; -1 leaves a number as it is."""
+    call("TAVOUserAgingSet", name, minimum, maximum, warning)
+
+
 @wraps("BlTLIBIsUserName")
 def is_name(name: str) -> bool:
-    return bool(lib.BlTLIBIsUserName(to_c(name)))
+    return bool(ask("BlTLIBIsUserName", name))
 
 
 def exists(name: str) -> bool:

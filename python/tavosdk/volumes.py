@@ -3,7 +3,7 @@ from __future__ import annotations
 
 import dataclasses
 
-from ._core import NotFoundError, c_names, call, lib, text, text_of, wraps
+from ._core import NotFoundError, ask, c_names, call, lib, text, text_of, wraps
 from ._owned import chain, record
 
 __getattr__, __dir__ = c_names("lvm", globals())
@@ -18,7 +18,7 @@ class PhysicalVolume:
 
 @wraps("LVMIsSupport")
 def supported() -> bool:
-    return bool(lib.LVMIsSupport())
+    return bool(ask("LVMIsSupport"))
 
 
 @wraps("LVMPvSBEnum")

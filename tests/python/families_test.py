@@ -6,6 +6,8 @@ import signal
 import subprocess
 import sys
 import textwrap
+import threading
+import time
 import unittest
 
 import tavosdk
@@ -91,6 +93,12 @@ class Records(unittest.TestCase):
         self.assertEqual(caught.exception.name, "ERR_INVALID_NETNAME")
         self.assertEqual(pathlib.Path("/etc/resolv.conf").read_text(), before)
         self.assertEqual(tavosdk.network.bonds(), [])
+
+    def test_interfaces_that_are_not_there(self):
+        network = tavosdk.network
+        for look in (lambda: network.card("eth77"), lambda: network.set_card(network.Card("eth77"))):
+            with self.assertRaises(tavosdk.NotFoundError):
+                look()
 
     def test_hosts_that_answered(self):
         list_file = pathlib.Path("/tmp/tavods.list")
@@ -184,6 +192,27 @@ class Lives(unittest.TestCase):
             os._exit(0)
         self.assertEqual(os.waitpid(child, 0)[1], 0)
         self.assertEqual(list(texts), ["a"])
+
+    def test_a_child_process_can_call_while_another_thread_is_in_the_library(self):
+        thread = threading.Thread(target=tavosdk.processes.run, args=("/bin/sleep", "1"), kwargs={"timeout": 5})
+        thread.start()
+        time.sleep(0.2)
+        child = os.fork()
+        if child == 0:
+            signal.alarm(10)  # a call that waits for the thread that the child does not have
+            os._exit(0 if tavosdk.users.is_name("anna") else 1)
+        self.assertEqual(os.waitpid(child, 0)[1], 0)
+        thread.join()
+
+    def test_a_list_may_be_closed_while_another_thread_reads_it(self):
+        for _ in range(20):
+            texts = tavosdk.lists.StringList(str(number) for number in range(500))
+            thread = threading.Thread(target=lambda: [list(texts) for _ in range(3)])
+            thread.start()
+            texts.append("more" * 1000)
+            texts.close()
+            thread.join()
+            self.assertEqual(list(texts), [])
 
     def test_a_lock_ends_with_an_exception_in_its_block(self):
         with self.assertRaises(KeyError):

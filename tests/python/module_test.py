@@ -105,6 +105,29 @@ class Accounts(unittest.TestCase):
         with self.assertRaises(tavosdk.Error):
             tavosdk.users.delete("admin")
 
+    def test_a_batch_adds_what_is_acceptable(self):
+        for name in set(tavosdk.users.names()) & {"bert", "cleo"}:
+            tavosdk.users.delete(name)
+        user = tavosdk.users.User
+        made = tavosdk.users.add(user("anna"), "secret")
+        added = tavosdk.users.add_many((user(name), "secret") for name in ("bert", "-bad", "Anna", "cleo", "bert"))
+        self.assertEqual([one.name for one in added], ["bert", "cleo"])
+        self.assertEqual(tavosdk.users.get("anna"), made)
+        self.assertEqual(tavosdk.users.add_many([]), [])
+        tavosdk.users.delete("bert", "cleo")
+
+    def test_a_locked_password_is_kept(self):
+        made = tavosdk.users.add(tavosdk.users.User("anna"), "secret")
+        tavosdk.users.lock("anna")
+        self.assertEqual(tavosdk.users.get("anna").hash, "!" + made.hash)
+        tavosdk.users.unlock("anna")
+        self.assertEqual(tavosdk.users.get("anna"), made)
+        tavosdk.users.set_password_age("anna", maximum=90)
+        line = next(line for line in pathlib.Path("/etc/shadow").read_text().splitlines() if line.startswith("anna:"))
+        self.assertEqual(line.split(":")[4], "90")
+        with self.assertRaises(tavosdk.NotFoundError):
+            tavosdk.users.lock("nobody-of-this-name")
+
     def test_groups(self):
         tavosdk.users.add(tavosdk.users.User("anna"), "secret")
         made = tavosdk.groups.set(tavosdk.groups.Group("team", members=["anna"], description="The team"))
@@ -140,6 +163,12 @@ class Files(unittest.TestCase):
         del file["b"]
         self.assertEqual(dict(file), {"a": "x" * 2000, "c": "3"})
         self.assertEqual(tavosdk.settings.lines(path)[0], "# kept")
+        inode = os.stat(path).st_ino
+        with self.assertRaises(tavosdk.Error):
+            file.update({"a": "2", "bad": "line\nbreak"})  # all or nothing
+        self.assertEqual((file["a"], os.stat(path).st_ino), ("x" * 2000, inode))
+        file.update([("a", "2")], d="4")
+        self.assertEqual(dict(file), {"a": "2", "c": "3", "d": "4"})
         for key in ("b", "none"):
             with self.assertRaises(KeyError):
                 del file[key]

@@ -33,6 +33,16 @@ class Reading(unittest.TestCase):
         self.assertEqual((names["rgslckList"].kind, names["rgslckList"].returns), ("datum", "TLIBLOCKFILE"))
         self.assertIn("Each returns 1 when the text is valid", names["BlTLIBIsMailbox"].section.text)
 
+    def test_records_come_with_the_remarks_on_their_fields(self):
+        found = {record.name for record in headers.records_of(headers.names()["RAIDInfoEnum"])}
+        self.assertEqual(found, {"RAIDLIST", "RAIDINFO", "RAIDMEMBER"})
+        record = headers.records()["TAVOUSER"]
+        self.assertIn("last valid day in days since 1970-01-01 UTC", record.code)
+        self.assertTrue(record.comment.text.startswith("One user. A single block"))
+        declared = {node.name for family in headers.families() for node in family.declarations
+                    if type(node).__name__ == "Typedef"}
+        self.assertEqual(set(headers.records()), declared)
+
     def test_every_exported_name_has_what_its_page_needs(self):
         names, known = headers.names(), headers.codes()
         self.assertEqual(set(names), headers.map_names())
@@ -92,6 +102,13 @@ class ManualPages(unittest.TestCase):
         self.assertEqual(len(re.findall(r': "[\w.-]+ - .+"', run.stdout)),
                          len(headers.names()) + len(list((tree / "docs/man").iterdir())))
 
+    def test_the_page_of_the_settings_has_every_key_of_the_services(self):
+        table = (tree / "lib/service/detail/service_table.cpp").read_text()
+        keys = set(re.findall(r'"((?:run|support)\w+|netbkp|download_enabled|userHomeEnable)"', table))
+        page = (tree / "docs/man/tavoinfo.conf.5").read_text()
+        self.assertEqual({key for key in keys if not re.search(rf"\b{key}\b", page)}, set())
+        self.assertGreater(len(keys), 20)
+
     def test_codes_are_sorted_from_all_places_that_name_them(self):
         errors = self.section("TAVOUserGet", "ERRORS")
         self.assertIn(".B ERR_NO_SUCH_USER\nthere is no such account", errors)       # its own table
@@ -104,6 +121,7 @@ class ManualPages(unittest.TestCase):
         self.assertIn("/usr/tavo/etc/rc.d", self.section("TAVONetService", "PROGRAMS"))
         self.assertNotIn("ERR_NO_SUCH_USER", self.section("TAVOUserGet", "RETURN VALUE"))
         self.assertIn("/etc/shadow", self.section("TAVOUserSet", "FILES"))
+        self.assertIn("char *szMail;             /* mail address */", self.section("TAVOUserGet", "RECORDS"))
 
 
 class HtmlPages(unittest.TestCase):
@@ -111,13 +129,14 @@ class HtmlPages(unittest.TestCase):
         class Reader(html.parser.HTMLParser):
             def __init__(self):
                 super().__init__()
-                self.links, self.places = [], set()
+                self.links, self.places, self.twice = [], set(), set()
 
             def handle_starttag(self, tag, attributes):
                 attributes = dict(attributes)
                 if tag in ("a", "link"):
                     self.links.append(attributes["href"])
                 if "id" in attributes:
+                    self.twice |= {attributes["id"]} & self.places
                     self.places.add(attributes["id"])
 
         with tempfile.TemporaryDirectory() as folder:
@@ -131,6 +150,7 @@ class HtmlPages(unittest.TestCase):
                     for target, _, place in [link.partition("#")]
                     if not (folder / target).exists() or place and place not in read[target].places]
             self.assertEqual(dead, [])
+            self.assertEqual({name: reader.twice for name, reader in read.items() if reader.twice}, {})
             self.assertEqual({place for reader in read.values() for place in reader.places} & headers.map_names(),
                              headers.map_names())
 

@@ -60,12 +60,21 @@ class Name:
 
 
 @dataclasses.dataclass
+class Record:
+    """A type that a header describes, as it is written there."""
+    name: str
+    code: str
+    comment: Comment
+
+
+@dataclasses.dataclass
 class Family:
     name: str                # "user" for tavo_user.h
     header: str
     title: str               # the first line of the header
     intro: Comment
     names: list
+    records: list
     declarations: list       # of pycparser, types too
     constants: list          # (name, value or None, remark) of enums and #defines
     strings: set             # the #defines among them that are texts
@@ -128,7 +137,8 @@ def _read_header(path, known):
                 and node.type.decls:
             known["struct " + node.type.name] = c_generator.CGenerator().visit(node) + ";"
     title, intro = _intro(comments)
-    family = Family(path.stem.removeprefix("tavo_"), path.name, title, intro, [], own, constants, strings, code)
+    family = Family(path.stem.removeprefix("tavo_"), path.name, title, intro, [], _records(source), own, constants,
+                    strings, code)
     constants += _enumerators(own, source.split("\n"))
     _collect_names(family, source.split("\n"), lines, comments, own)
     return family
@@ -155,6 +165,19 @@ def _macros(source):
         if value.startswith('"'):
             strings.add(name)
     return constants, strings
+
+
+_RECORD = re.compile(
+    r"^(?:typedef struct[^;{]*\{.*?^\} (\w+);|struct (\w+) \{.*?^\};|typedef \w+ \(\*(\w+)\)[^;]*;)", re.M | re.S)
+
+
+def _records(source):
+    found = []
+    for record in _RECORD.finditer(source):
+        above = re.search(r"/\*(?:(?!\*/).)*\*/\n\Z", source[:record.start()], re.S)
+        comment = read_comment(above.group().strip()) if above else Comment("")
+        found.append(Record(next(filter(None, record.groups())), record.group(), comment))
+    return found
 
 
 def _enumerators(nodes, lines):
@@ -277,6 +300,24 @@ def _prototype(lines, first, last):
 def names():
     """Every exported name by itself."""
     return {entry.name: entry for family in families() for entry in family.names}
+
+
+def records():
+    """Every type that the headers describe."""
+    return {record.name: record for family in families() for record in family.records}
+
+
+def records_of(entry):
+    """The types in the declarations that one comment describes, each before those that it is made of."""
+    known = records()
+    text = " ".join(other.prototype for other in entry.family.names if other.name in (entry.group or [entry.name]))
+    found, waiting = [], re.findall(r"\w+", text)
+    while waiting:
+        name = waiting.pop(0)
+        if name in known and known[name] not in found:
+            found.append(known[name])
+            waiting += re.findall(r"\w+", re.sub(r"/\*.*?\*/", "", known[name].code, flags=re.S))
+    return found
 
 
 def map_names():

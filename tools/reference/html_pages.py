@@ -9,18 +9,21 @@ import page as pages
 _STYLE = """
 :root { color-scheme: light dark; --line: #8884; --soft: #8881; --link: #0b63b0; }
 @media (prefers-color-scheme: dark) { :root { --link: #7ab8f5; } }
-body { font: 16px/1.5 system-ui, sans-serif; margin: 0; display: grid; grid-template-columns: 15rem minmax(0, 52rem); }
+body { font: 16px/1.5 system-ui, sans-serif; margin: 0; display: grid; grid-template-columns: 13rem minmax(0, 66rem); }
 nav { border-right: 1px solid var(--line); padding: 1.5rem 1rem; position: sticky; top: 0; height: 100vh;
       overflow: auto; box-sizing: border-box; }
-nav a { display: block; padding: .1rem 0; }
+nav a { display: block; padding: .1rem 0; } nav a[aria-current] { font-weight: 600; color: inherit; }
 main { padding: 1.5rem 2rem 6rem; }
 a { color: var(--link); text-decoration: none; } a:hover { text-decoration: underline; }
 h2 { margin-top: 2.5rem; padding-top: 1rem; border-top: 1px solid var(--line); font-size: 1.2rem; }
 h3 { margin: 1rem 0 .2rem; font-size: .8rem; text-transform: uppercase; letter-spacing: .06em; opacity: .7; }
-pre, code { font: 14px/1.45 ui-monospace, monospace; } pre { margin: .5rem 0; overflow-x: auto; }
+pre, code { font: 13px/1.45 ui-monospace, monospace; } pre { margin: .5rem 0; overflow-x: auto; }
 pre.synopsis { background: var(--soft); padding: .7rem 1rem; border-radius: 6px; }
 p { margin: .5rem 0; } table { border-collapse: collapse; } td, th { padding: .2rem .8rem .2rem 0; text-align: left;
       vertical-align: top; }
+p, h1 { max-width: 48rem; }
+.names { columns: 16rem; padding: 0; list-style: none; font-size: .9rem; }
+h2 a, tr:target code, div:target pre { color: inherit; } :target { background: var(--soft); scroll-margin-top: 1rem; }
 .part { margin-top: 3rem; font-size: 1.4rem; font-weight: 600; color: var(--link); }
 .section { margin-top: 3rem; padding: .4rem 1rem; background: var(--soft); border-left: 3px solid var(--link); }
 @media (max-width: 50rem) { body { display: block; } nav { position: static; height: auto; border: 0; } }
@@ -30,9 +33,12 @@ _INDEXES = (("errors", "Codes", "by code"), ("files", "Files", "by file"), ("run
             ("locks", "Locks", "by lock"))
 
 
-def _frame(title, body, families):
-    links = "".join(f'<a href="{family.name}.html">{family.name}</a>' for family in families)
-    indexes = "".join(f'<a href="index-{name}.html">{label}</a>' for name, label, _ in _INDEXES)
+def _frame(page, title, body, families):
+    def link(name, label):
+        return f'<a href="{name}.html"{" aria-current=page" if name == page else ""}>{label}</a>'
+
+    links = "".join(link(family.name, family.name) for family in families)
+    indexes = "".join(link(f"index-{name}", label) for name, label, _ in _INDEXES)
     return (f'<!DOCTYPE html>\n<html lang="en"><head><meta charset="utf-8">'
             f'<meta name="viewport" content="width=device-width"><title>{html.escape(title)}</title>'
             f'<link rel="stylesheet" href="style.css"></head><body><nav><a href="index.html"><b>tavosdk</b></a>'
@@ -40,15 +46,21 @@ def _frame(title, body, families):
 
 
 class _Linker:
-    def __init__(self, names):
-        self.names = names
+    """Turns text into HTML in which every name of a function, type, constant or code leads to its description."""
+
+    def __init__(self, families):
+        self.places = {}
+        for family in families:
+            for name in ([constant for constant, *_ in family.constants] + [record.name for record in family.records] +
+                         [entry.name for entry in family.names]):
+                self.places[name] = f"{family.name}.html#{name}"
 
     def __call__(self, text, here=None):
         def link(found):
             name = found.group()
-            if name not in self.names or name == here:
+            if name not in self.places or name == here:
                 return name
-            return f'<a href="{self.names[name].family.name}.html#{name}">{name}</a>'
+            return f'<a href="{self.places[name]}">{name}</a>'
         return re.sub(r"\b[A-Za-z]\w{4,}\b", link, html.escape(text, quote=False))
 
 
@@ -77,8 +89,9 @@ def _runs_of(lines):
 
 def _entry(group, page, link):
     first = group[0]
-    heading = ", ".join(f'<span id="{entry.name}">{entry.name}</span>' for entry in group)
-    synopsis = "\n".join(html.escape(line, quote=False) for entry in group for line in entry.declaration())
+    page_name = first.family.name
+    heading = ", ".join(f'<a id="{entry.name}" href="{page_name}.html#{entry.name}">{entry.name}</a>' for entry in group)
+    synopsis = "\n".join(link(line, entry.name) for entry in group for line in entry.declaration())
     out = [f"<h2>{heading}</h2><pre class=synopsis>{synopsis}</pre>", _prose(first.comment.text, link, first.name)]
     for label, items in (("Files", page.files if first.comment.fixed.get("Files") else []),
                          ("Programs", page.runs), ("Locks", page.locks)):
@@ -96,12 +109,26 @@ def _section(text, link):
     return f'<div class="section">{_prose(text, link)}</div>'
 
 
+def _records(family, link):
+    if not family.records:
+        return ""
+    return "<h2>Records</h2>" + "".join(
+        f"<div id=\"{record.name}\">{_prose(record.comment.text, link)}"
+        f"<pre class=synopsis>{link(record.code, record.name)}</pre></div>"
+        for record in family.records)
+
+
 def _constants(family):
     if not family.constants:
         return ""
-    rows = "".join(f"<tr><td><code>{name}</code><td><code>{html.escape(value or '')}</code>"
+    rows = "".join(f"<tr id=\"{name}\"><td><code>{name}</code><td><code>{html.escape(value or '')}</code>"
                    f"<td>{html.escape(remark)}" for name, value, remark in family.constants)
     return f"<h2>Constants</h2><table>{rows}</table>"
+
+
+def _names(entries):
+    items = "".join(f'<li><a href="{entry.family.name}.html#{entry.name}">{entry.name}</a>' for entry in entries)
+    return f"<ul class=names>{items}</ul>"
 
 
 def _index(kind, everything):
@@ -118,20 +145,20 @@ def write(folder, version):
     families, names = headers.families(), headers.names()
     everything = pages.pages()
     page_of = {entry.name: page for entry, page in everything}
-    link = _Linker(names)
+    link = _Linker(families)
     (folder / "style.css").write_text(_STYLE)
 
     rows = "".join(f'<tr><td><a href="{family.name}.html">{family.name}</a><td>{link(family.title)}'
                    f"<td>{len(family.names)}" for family in families)
-    listed = " ".join(f'<a href="{names[name].family.name}.html#{name}">{name}</a><br>' for name in sorted(names))
-    (folder / "index.html").write_text(_frame("tavosdk", (
+    listed = _names(names[name] for name in sorted(names, key=str.lower))
+    (folder / "index.html").write_text(_frame("index", "tavosdk", (
         f"<h1>tavosdk {version}</h1><p>The system programming interface of a network-attached-storage appliance: "
         f"{len(names)} names in {len(families)} families.</p><table><tr><th>Family<th><th>Names</tr>{rows}</table>"
-        f"<h2>All names</h2><p>{listed}</p>"), families))
+        f"<h2>All names</h2>{listed}"), families))
 
     for family in families:
         body = [f"<h1>{link(family.title.rstrip('.'))}</h1><pre class=synopsis>#include &lt;{family.header}&gt;</pre>",
-                _prose(family.intro.text, link)]
+                _prose(family.intro.text, link), _names(family.names)]
         done, section = set(), None
         for entry in family.names:
             if entry.section.text != section:
@@ -141,13 +168,13 @@ def write(folder, version):
                 group = [other for other in family.names if other.name in entry.group] or [entry]
                 done |= {other.name for other in group}
                 body.append(_entry(group, page_of[entry.name], link))
-        body.append(_constants(family))
-        (folder / f"{family.name}.html").write_text(_frame(f"tavosdk: {family.name}", "".join(body), families))
+        body += [_records(family, link), _constants(family)]
+        (folder / f"{family.name}.html").write_text(_frame(family.name, f"tavosdk: {family.name}", "".join(body), families))
 
     for kind, label, how in _INDEXES:
         index = _index(kind, everything)
-        rows = "".join(f"<tr><td><code>{html.escape(key)}</code><td>" + ", ".join(
+        rows = "".join(f"<tr><td><code>{link(key)}</code><td>" + ", ".join(
             f'<a href="{entry.family.name}.html#{entry.name}">{entry.name}</a>' for entry in index[key])
             for key in sorted(index))
         body = f"<h1>{label}</h1><p>Functions {how}.</p><table>{rows}</table>"
-        (folder / f"index-{kind}.html").write_text(_frame(f"tavosdk: {label}", body, families))
+        (folder / f"index-{kind}.html").write_text(_frame(f"index-{kind}", f"tavosdk: {label}", body, families))

@@ -55,6 +55,12 @@ def manual_page(entry, page, version):
                 out += [".TP", f".B {code}", _escape(said)]
         else:
             out += ["This function names no code of its own; see DESCRIPTION."]
+    records = headers.records_of(entry)
+    if records:
+        out += [".SH RECORDS"]
+        for record in records:
+            out += _paragraphs(record.comment.text) + [".PP", ".nf", _escape(record.code), ".fi", ".PP"]
+        out.pop()
     if page.runs:
         out += [".SH PROGRAMS"] + [part for item in page.runs for part in (_escape(item), ".br")]
     if page.locks:
