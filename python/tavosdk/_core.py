@@ -6,7 +6,7 @@ import threading
 from typing import Any, Callable, Iterable, TypeVar
 
 from ._reference import NAMES
-from ._tavosdk import ffi, lib
+from ._tavosdk import ffi as ffi, lib as lib
 
 Function = TypeVar("Function", bound=Callable[..., Any])
 

@@ -19,7 +19,7 @@ class ExpansionUnit:
 
 @wraps("TAVOMaxDiskGet")
 def bays() -> int:
-    return ask("TAVOMaxDiskGet")
+    return int(ask("TAVOMaxDiskGet"))
 
 
 @wraps("TAVOEBoxInfoEnum")

@@ -45,14 +45,14 @@ def all() -> list[Disk]:
 @wraps("TAVODiskTemperatureGet")
 def temperature(path: str) -> int:
     """Degrees Celsius. Wakes a disk that sleeps."""
-    return call("TAVODiskTemperatureGet", path)
+    return int(call("TAVODiskTemperatureGet", path))
 
 
 @wraps("TAVOIDiskCheckPower")
 def in_standby(path: str) -> bool:
     state = ffi.new("unsigned char *")
     call("TAVOIDiskCheckPower", path, state)
-    return state[0] == 0
+    return bool(state[0] == 0)
 
 
 @wraps("TAVOIDiskSetDiskStandby")

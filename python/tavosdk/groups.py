@@ -21,7 +21,8 @@ class Group:
 def _get(function: str, key: str | int) -> Group:
     with record("TAVOGROUP", "TAVOGroupFree") as cell:
         call(function, key, cell)
-        group, members = cell[0], []
+        group = cell[0]
+        members: list[str] = []
         while (member := string(group.rgszMember[len(members)])) is not None:
             members.append(member)
         return Group(text(group.szName), group.nGid, members, description(text(group.szName)))

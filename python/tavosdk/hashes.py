@@ -38,7 +38,7 @@ class StringHash(Block, MutableMapping[str, str]):
 
     def __len__(self) -> int:
         with one_call:
-            return self.pointer.nPair if self.open else 0
+            return int(self.pointer.nPair) if self.open else 0
 
     def __iter__(self) -> Iterator[str]:
         with one_call, StringList() as keys:

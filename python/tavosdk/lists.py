@@ -23,7 +23,7 @@ class StringList(Block, MutableSequence[str]):
 
     def __len__(self) -> int:
         with one_call:
-            return self.pointer.nItem if self.open else 0
+            return int(self.pointer.nItem) if self.open else 0
 
     def _index(self, index: int) -> int:
         place = index + len(self) if index < 0 else index
@@ -66,7 +66,7 @@ class StringList(Block, MutableSequence[str]):
             found, error = quietly(function, self.pointer, value)
         if error:
             raise error
-        return found
+        return int(found)
 
     def __contains__(self, value: object) -> bool:
         return isinstance(value, str) and any(item == value for item in self)

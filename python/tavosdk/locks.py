@@ -13,7 +13,7 @@ _WAYS = ("SHARED", "EXCLUSIVE", "NONBLOCKING")
 #: The names of the locks, in the order in which a request takes them, with their bits.
 LOCKS: dict[str, int] = dict(sorted(
     ((name.removeprefix("TAVO_LOCK_").lower(), getattr(lib, name)) for name in dir(lib)
-     if name.startswith("TAVO_LOCK_") and name.removeprefix("TAVO_LOCK_") not in _WAYS), key=lambda pair: pair[1]))
+     if name.startswith("TAVO_LOCK_") and name.removeprefix("TAVO_LOCK_") not in _WAYS), key=lambda pair: int(pair[1])))
 
 
 @contextlib.contextmanager

@@ -12,7 +12,7 @@ def run(program: Path, *arguments: str, timeout: int) -> int:
     """Runs a program by its path for at most timeout seconds and returns its exit code. It has no input, no output and no
     environment but PATH."""
     given = [ffi.new("char[]", to_c(argument)) for argument in arguments]
-    return call("TLIBTimedExec", timeout, program, *given, ffi.cast("char *", 0))
+    return int(call("TLIBTimedExec", timeout, program, *given, ffi.cast("char *", 0)))
 
 
 @wraps("TLIBPs")

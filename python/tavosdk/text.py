@@ -25,7 +25,7 @@ def upper(value: str) -> str:
 @wraps("TLIBUnicodeUTF8StrCaseCmp")
 def compare(left: str, right: str) -> int:
     """-1, 0 or 1 as left is less than, equal to or greater than right, without regard to case."""
-    return call("TLIBUnicodeUTF8StrCaseCmp", left, right, fails=lambda result: result == -2)
+    return int(call("TLIBUnicodeUTF8StrCaseCmp", left, right, fails=lambda result: bool(result == -2)))
 
 
 @wraps("TLIBStrTrimSpace")
