@@ -208,9 +208,7 @@ int main(int argc, char **argv)
                     in_python("module", "read_setting_module"),
                     in_python("ctypes", "read_setting_ctypes")});
     bench::Compare("python_get_user", 100,
-                   {{"tavo", GetUser},
-                    in_python("module", "get_user_module"),
-                    in_python("pwd", "get_user_pwd")});
+                   {{"tavo", GetUser}, in_python("module", "get_user_module"), in_python("pwd", "get_user_pwd")});
     bench::Compare("python_list_users", kUsers, {{"tavo", ListUsers}, in_python("module", "list_users_module")});
     return bench::Run(argc, argv);
 }

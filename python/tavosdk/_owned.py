@@ -37,7 +37,7 @@ class Block:
         with one_call:
             self.__del__()
 
-    # Nobody else uses an object that dies, and a thread that ends with the interpreter may never release the lock.
+    # Without the lock: no other thread uses an object that dies, and one that ends with the interpreter may keep it.
     def __del__(self) -> None:
         if self.open:
             getattr(lib, self._frees)(self.cell[0])

@@ -46,8 +46,8 @@ def card(interface: str) -> Card:
 
 @wraps("TAVONetSetCard1")
 def set_card(wanted: Card) -> Card:
-    """Gives an interface its address, by DHCP or a static one, and returns it as it is then. The MTU has a function of
-    its own."""
+    """Sets the address of an interface, by DHCP or a static one, and returns the interface as it is afterwards. `set_mtu`
+    sets the size of its packets."""
     previous = _read("TAVONetGetCard", wanted.interface)
     record = ffi.new("TAVONETCARD *", previous[0])
     record.nMode = lib.TAVO_NET_DHCP if wanted.dhcp else lib.TAVO_NET_STATIC

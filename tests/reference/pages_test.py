@@ -121,7 +121,7 @@ class ManualPages(unittest.TestCase):
         self.assertIn("/usr/tavo/etc/rc.d", self.section("TAVONetService", "PROGRAMS"))
         self.assertNotIn("ERR_NO_SUCH_USER", self.section("TAVOUserGet", "RETURN VALUE"))
         self.assertIn("/etc/shadow", self.section("TAVOUserSet", "FILES"))
-        self.assertIn("char *szMail;             /* mail address */", self.section("TAVOUserGet", "RECORDS"))
+        self.assertIn("char *szMail;             /* mail address */", self.section("TAVOUserGet", "TYPES"))
 
 
 class HtmlPages(unittest.TestCase):

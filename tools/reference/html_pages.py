@@ -25,6 +25,7 @@ p, h1 { max-width: 48rem; }
 .names { columns: 16rem; padding: 0; list-style: none; font-size: .9rem; }
 h2 a, tr:target code, div:target pre { color: inherit; } :target { background: var(--soft); scroll-margin-top: 1rem; }
 .part { margin-top: 3rem; font-size: 1.4rem; font-weight: 600; color: var(--link); }
+.part + h2 { border-top: 0; margin-top: .5rem; padding-top: 0; }
 .section { margin-top: 3rem; padding: .4rem 1rem; background: var(--soft); border-left: 3px solid var(--link); }
 @media (max-width: 50rem) { body { display: block; } nav { position: static; height: auto; border: 0; } }
 """
@@ -64,13 +65,21 @@ class _Linker:
         return re.sub(r"\b[A-Za-z]\w{4,}\b", link, html.escape(text, quote=False))
 
 
+# What a function returns begins a line of its comment, and is looked for by itself.
+_NEW_SUBJECT = re.compile(r"\n(?=(?:Returns?|Fails|Both return|They return)\b)")
+
+
 def _prose(text, link, here=None):
     """Paragraphs filled, indented lines as they are written."""
     out = []
     for block in re.split(r"\n\s*\n", text):
         for indented, lines in _runs_of(block.split("\n")):
-            joined = "\n".join(lines)
-            out.append(f"<pre>{link(joined, here)}</pre>" if indented else f"<p>{link(joined, here)}</p>")
+            joined = link("\n".join(lines), here)
+            if indented:
+                out.append(f"<pre>{joined}</pre>")
+            else:
+                joined = re.sub(r"`([^`\n]+)`", r"<code>\1</code>", joined)
+                out += [f"<p>{part}</p>" for part in _NEW_SUBJECT.split(joined)]
     return "".join(out)
 
 
@@ -91,7 +100,7 @@ def _entry(group, page, link):
     first = group[0]
     page_name = first.family.name
     heading = ", ".join(f'<a id="{entry.name}" href="{page_name}.html#{entry.name}">{entry.name}</a>' for entry in group)
-    synopsis = "\n".join(link(line, entry.name) for entry in group for line in entry.declaration())
+    synopsis = "\n".join(link(line, entry.name) for entry in group for line in entry.declaration(width=110))
     out = [f"<h2>{heading}</h2><pre class=synopsis>{synopsis}</pre>", _prose(first.comment.text, link, first.name)]
     for label, items in (("Files", page.files if first.comment.fixed.get("Files") else []),
                          ("Programs", page.runs), ("Locks", page.locks)):
@@ -112,7 +121,7 @@ def _section(text, link):
 def _records(family, link):
     if not family.records:
         return ""
-    return "<h2>Records</h2>" + "".join(
+    return "<h2>Types</h2>" + "".join(
         f"<div id=\"{record.name}\">{_prose(record.comment.text, link)}"
         f"<pre class=synopsis>{link(record.code, record.name)}</pre></div>"
         for record in family.records)

@@ -57,7 +57,7 @@ def manual_page(entry, page, version):
             out += ["This function names no code of its own; see DESCRIPTION."]
     records = headers.records_of(entry)
     if records:
-        out += [".SH RECORDS"]
+        out += [".SH TYPES"]
         for record in records:
             out += _paragraphs(record.comment.text) + [".PP", ".nf", _escape(record.code), ".fi", ".PP"]
         out.pop()
