@@ -4,8 +4,6 @@
  * The tables are compiled in and constant. All state is elsewhere: the enable keys in /etc/tavoinfo.conf, the
  * capabilities of the model in /etc.defaults/tavoinfo.conf, the data folders to which the links under /var/services
  * point, and the daemons, which the scripts under /usr/tavo/etc/rc.d/ start and stop.
- *
- * Files: /etc/tavoinfo.conf, /etc.defaults/tavoinfo.conf, /usr/tavo/etc/share.conf, /var/services
  */
 #ifndef TAVO_SERVICE_H
 #define TAVO_SERVICE_H
@@ -137,7 +135,8 @@ TAVO_API int TAVOServiceDaemonGet(const char *szName);
  * is a link.
  * Returns 1 when the folder exists on a volume, 0 when not, -1 with *pShare filled in as far as known and
  *   ERR_BAD_PARAMETERS  bad id or NULL; *pShare untouched
- *   ERR_UNKNOWN         the link cannot be read, or its target is longer than 51 bytes */
+ *   ERR_UNKNOWN         the link cannot be read, or its target is longer than 51 bytes
+ * Files: /etc.defaults/tavoinfo.conf, /var/services */
 TAVO_API int TAVOServiceSettingGet(int idShare, TAVOSERVICESHARE *pShare);
 
 /* Reads the link szLink: copies its target to szVolume (cbVolume bytes) and the directory that holds the target to
@@ -155,22 +154,27 @@ TAVO_API int TAVOServiceVolumeGetbyLink(const char *szLink, char *szVolume, int 
 TAVO_API int TAVOServiceEnableGet(int idShare);
 
 /* Returns 1 when the status handler of service id reports it as enabled, bound and running, else 0. ERR_BAD_PARAMETERS:
- * bad id, or the empty row. */
+ * bad id, or the empty row.
+ * Files: /etc/tavoinfo.conf, /var/services */
 TAVO_API int TAVOServiceStatusGet(int id);
 
 /* Pushes the names of the services that the model supports onto *ppNames, which may move; a service without data
- * folders always counts. Returns the number pushed, or -1 with ERR_BAD_PARAMETERS (NULL) or ERR_OUT_OF_MEMORY. */
+ * folders always counts. Returns the number pushed, or -1 with ERR_BAD_PARAMETERS (NULL) or ERR_OUT_OF_MEMORY.
+ * Files: /etc.defaults/tavoinfo.conf */
 TAVO_API int TAVOServiceGetAll(TLIBSZLIST **ppNames);
 
-/* The same for the services that have a data folder on volume szVolume ("/volume1"). */
+/* The same for the services that have a data folder on volume szVolume ("/volume1").
+ * Files: /var/services */
 TAVO_API int TAVOServiceGetbyVolume(const char *szVolume, TLIBSZLIST **ppNames);
 
 /* Copies the volume ("/volume1") of the share szShare, as recorded in /usr/tavo/etc/share.conf, to szVolume.
- * Returns the length with its NUL, 0 with ERR_NO_SUCH_SHARE, -1 with ERR_BAD_PARAMETERS or ERR_NOT_ENOUGH_MEMORY. */
+ * Returns the length with its NUL, 0 with ERR_NO_SUCH_SHARE, -1 with ERR_BAD_PARAMETERS or ERR_NOT_ENOUGH_MEMORY.
+ * Files: /usr/tavo/etc/share.conf */
 TAVO_API int TAVOServiceVolumeGetbyShare(const char *szShare, char *szVolume, int cbVolume);
 
 /* Returns 1 when the link of data folder idShare points to a folder on volume szVolume, 0 when not, -1 with
- * ERR_BAD_PARAMETERS or a code of TAVOServiceSettingGet. */
+ * ERR_BAD_PARAMETERS or a code of TAVOServiceSettingGet.
+ * Files: /etc.defaults/tavoinfo.conf, /var/services */
 TAVO_API int TAVOServiceIsOnVolume(int idShare, const char *szVolume);
 
 /* Searches every mounted volume for an existing folder of data folder idShare; the path of the first such volume is
@@ -187,17 +191,22 @@ TAVO_API int TAVOServiceDataSearch(int idShare, char *szVolume, int cbVolume);
  *   ERR_BAD_PARAMETERS      bad id or action, or an action that a service without a key does not have
  *   ERR_SERVICE_ACTION      the service cannot be switched
  *   ERR_SERVICE_STD_ACTION  its script or its daemons failed
- *   or a code of a function that the service's handler calls */
+ *   or a code of a function that the service's handler calls
+ * Files: /etc/tavoinfo.conf, /etc.defaults/tavoinfo.conf, /usr/tavo/etc/share.conf, /var/services
+ * Runs: /usr/tavo/etc/rc.d */
 TAVO_API int TAVOServiceActionSet(int id, int action);
 
 /* The standard handlers: of the action (see TAVOServiceActionSet), and of the status. A service counts as enabled
  * unless its key is "no". The status handler reads the key under TAVO_LOCK_TAVOINFO (shared, at most 5 s).
+ * Files: /etc/tavoinfo.conf, /etc.defaults/tavoinfo.conf, /usr/tavo/etc/share.conf, /var/services
  * Runs: /usr/tavo/etc/rc.d
  * Locks: TAVO_LOCK_TAVOINFO */
 TAVO_API int TAVOServiceSTDAction(const TAVOSERVICE *pService, int action);
 TAVO_API int TAVOServiceSTDStatus(const TAVOSERVICE *pService);
 
-/* The handlers of single services; their sources describe what they do beyond the standard ones. */
+/* The handlers of single services; their sources describe what they do beyond the standard ones.
+ * Files: /etc/tavoinfo.conf, /etc.defaults/tavoinfo.conf, /usr/tavo/etc/share.conf, /var/services
+ * Runs: /usr/tavo/etc/rc.d */
 TAVO_API int TAVOServiceAFP(const TAVOSERVICE *pService, int action);
 TAVO_API int TAVOServiceAudio(const TAVOSERVICE *pService, int action);
 TAVO_API int TAVOServiceHTTPS(const TAVOSERVICE *pService, int action);
@@ -226,11 +235,14 @@ TAVO_API int TAVOServiceiTunesStatus(const TAVOSERVICE *pService);
  * Locks: TAVO_LOCK_TAVOINFO, TAVO_LOCK_SMB, TAVO_LOCK_APPLE */
 TAVO_API int TAVONetService(uint32_t fDaemon, int operation);
 
-/* Sets the enable key of data folder idShare to "no" and nothing else. Returns 0 or -1. */
+/* Sets the enable key of data folder idShare to "no" and nothing else. Returns 0 or -1.
+ * Files: /etc/tavoinfo.conf */
 TAVO_API int TAVOServiceDisableSet(int idShare);
 
 /* Stops (fOn 0) or starts (fOn 1) every enabled service, the last ones first when stopping; keys stay unchanged.
- * Failures are logged and do not stop it. Returns the number of services that were switched. */
+ * Failures are logged and do not stop it. Returns the number of services that were switched.
+ * Files: /etc/tavoinfo.conf, /etc.defaults/tavoinfo.conf, /usr/tavo/etc/share.conf, /var/services
+ * Runs: /usr/tavo/etc/rc.d */
 TAVO_API int TAVOServiceOnOffALL(int fOn);
 
 /* Runs the start-up scripts of installed packages (/usr/tavo/etc/rc.d/packages, in the order of their names, in
@@ -250,12 +262,15 @@ TAVO_API int TAVOServiceThirdPartyAll(const char *szAction);
 /* Chooses the volume of data folder idShare: the one that its link names if that is mounted and the folder exists,
  * else the mounted and writable one with the most free space. Its path is copied to szVolume. Returns its number, 0
  * with
- * ERR_NO_SERVICE_VOLUME, -1 with ERR_BAD_PARAMETERS, or with ERR_UNKNOWN when the link cannot be read. */
+ * ERR_NO_SERVICE_VOLUME, -1 with ERR_BAD_PARAMETERS, or with ERR_UNKNOWN when the link cannot be read.
+ * Files: /var/services */
 TAVO_API int TAVOServiceNewVolumeDecide(int idShare, char *szVolume, int cbVolume);
 
 /* Binds data folder idShare to volume szVolume: creates the share, then sets the link. A volume that is not mounted is
  * accepted and logged as an error: data written there ends up on the system disk. Returns 0, or -1 with the code of
- * TAVOServiceShareCreate or TAVOServiceLinkSet; a share that was created stays when the link fails. */
+ * TAVOServiceShareCreate or TAVOServiceLinkSet; a share that was created stays when the link fails.
+ * Files: /usr/tavo/etc/share.conf, /var/services
+ * Locks: TAVO_LOCK_SMB (exclusive, at most 5 s) */
 TAVO_API int TAVOServiceSet(int idShare, const char *szVolume);
 
 /* Copies the path of data folder idShare on volume szVolume to szPath. Returns its length with the NUL, or -1 with
@@ -263,36 +278,46 @@ TAVO_API int TAVOServiceSet(int idShare, const char *szVolume);
 TAVO_API int TAVOServiceShareGen(int idShare, const char *szVolume, char *szPath, int cbPath);
 
 /* Creates the folder (and its parents below the volume) and records the share; an existing folder is used unchanged.
- * Returns 0, or -1 with ERR_BAD_PARAMETERS, ERR_MKDIR_FAILED, ERR_NOT_ENOUGH_SPACE or a code of the settings files. */
+ * Returns 0, or -1 with ERR_BAD_PARAMETERS, ERR_MKDIR_FAILED, ERR_NOT_ENOUGH_SPACE or a code of the settings files.
+ * Files: /usr/tavo/etc/share.conf
+ * Locks: TAVO_LOCK_SMB (exclusive, at most 5 s) */
 TAVO_API int TAVOServiceShareCreate(int idShare, const char *szVolume);
 
-/* Records a new volume for a share that exists; nothing is moved. Returns 0, or -1 (ERR_NO_SUCH_SHARE, ...). */
+/* Records a new volume for a share that exists; nothing is moved. Returns 0, or -1 (ERR_NO_SUCH_SHARE, ...).
+ * Files: /usr/tavo/etc/share.conf
+ * Locks: TAVO_LOCK_SMB (exclusive, at most 5 s) */
 TAVO_API int TAVOServiceShareUpdate(int idShare, const char *szVolume);
 
 /* Removes the record of the share and, with fDelete 1, deletes its folder; links in it are deleted, never followed. A
  * share that is not recorded is not a failure. Returns 0, or -1 with ERR_REMOVE_FAILED or a code of the settings files.
- * */
+ * Files: /usr/tavo/etc/share.conf
+ * Locks: TAVO_LOCK_SMB (exclusive, at most 5 s) */
 TAVO_API int TAVOServiceShareRemove(int idShare, int fDelete);
 
 /* Returns 1 when the folder to which the link points is empty, 0 when not, -1 with ERR_BAD_PARAMETERS, or ERR_MAKE_PATH
- * when it cannot be opened or reading it fails. */
+ * when it cannot be opened or reading it fails.
+ * Files: /var/services */
 TAVO_API int TAVOServiceShareIsEmpty(int idShare);
 
 /* Points the link of data folder idShare at szTarget; an existing link is replaced, anything else is left alone.
  * Returns 0, or -1 with
  *   ERR_BAD_PARAMETERS    bad id, or szTarget is NULL or empty
  *   ERR_NOT_ENOUGH_SPACE  no room for /var/services
- *   ERR_MKDIR_FAILED      /var/services or the link could not be created */
+ *   ERR_MKDIR_FAILED      /var/services or the link could not be created
+ * Files: /var/services */
 TAVO_API int TAVOServiceLinkSet(int idShare, const char *szTarget);
 
 /* Removes the link; a missing link is not a failure. Returns 0, or -1 with ERR_BAD_PARAMETERS, or ERR_REMOVE_FAILED
- * when something else is in its place or the link cannot be removed. */
+ * when something else is in its place or the link cannot be removed.
+ * Files: /var/services */
 TAVO_API int TAVOServiceLinkRemove(int idShare);
 
 /* Release data folders, first the link, then the share: one folder, those of a service (by row or by id), of every
  * service that has a folder on a volume, or all. A folder that another enabled service uses is kept. Return 0, or -1
  * with
- * ERR_SERVICE_REMOVE after the other folders have been released. */
+ * ERR_SERVICE_REMOVE after the other folders have been released.
+ * Files: /etc/tavoinfo.conf, /usr/tavo/etc/share.conf, /var/services
+ * Locks: TAVO_LOCK_SMB (exclusive, at most 5 s) */
 TAVO_API int TAVOServiceRemove(int idShare, int fDelete);
 TAVO_API int TAVOServiceRemovebyInfo(const TAVOSERVICE *pService, int fDelete);
 TAVO_API int TAVOServiceRemovebyID(int id, int fDelete);
@@ -300,15 +325,21 @@ TAVO_API int TAVOServiceRemovebyVolume(const char *szVolume, int fDelete);
 TAVO_API int TAVOServiceRemoveAll(int fDelete);
 
 /* Binds data folder idShare to another volume and restarts the services that use it and are enabled; data is not moved.
- * Returns 0 or -1. */
+ * Returns 0 or -1.
+ * Files: /etc/tavoinfo.conf, /etc.defaults/tavoinfo.conf, /usr/tavo/etc/share.conf, /var/services
+ * Runs: /usr/tavo/etc/rc.d */
 TAVO_API int TAVOServiceVolumeChange(int idShare, const char *szVolume);
 
 /* For a volume szVolume that is available again: sets the links of the data folders on it whose services are enabled,
- * and starts those services. Returns the number of folders that were bound again, or -1 with ERR_BAD_PARAMETERS. */
+ * and starts those services. Returns the number of folders that were bound again, or -1 with ERR_BAD_PARAMETERS.
+ * Files: /etc/tavoinfo.conf, /etc.defaults/tavoinfo.conf, /var/services
+ * Runs: /usr/tavo/etc/rc.d */
 TAVO_API int TAVOServiceRestore(const char *szVolume);
 
 /* For the first volume after a time without any: enables the data folders of every enabled service whose link is
- * broken, and restarts the service. Returns the number of services that were restarted. */
+ * broken, and restarts the service. Returns the number of services that were restarted.
+ * Files: /etc/tavoinfo.conf, /etc.defaults/tavoinfo.conf, /usr/tavo/etc/share.conf, /var/services
+ * Runs: /usr/tavo/etc/rc.d */
 TAVO_API int TAVOServiceRestartfromVolumeNone(void);
 
 TAVO_END_DECLS

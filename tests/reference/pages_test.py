@@ -49,6 +49,13 @@ class Reading(unittest.TestCase):
         self.assertEqual([(entry.name, lack) for entry, page in pages.pages()
                           for lack in pages.wanting(entry, page, names, known)], [])
 
+    def test_what_only_releases_or_only_looks_up_is_in_no_index(self):
+        found = {entry.name: page for entry, page in pages.pages()}
+        for name in ("RAIDInfoFree", "RAIDInfoDup", "DiskInfoEnumFree", "TAVOServiceNameGet"):
+            self.assertEqual((found[name].files, found[name].runs, found[name].locks), ([], [], []), name)
+        self.assertEqual(found["DiskInfoEnumFree"].errors, [])
+        self.assertIn("/usr/tavo/etc/share.conf", found["TAVOServiceShareCreate"].files)
+
     def test_a_program_that_the_page_does_not_name_is_found(self):
         names, known = headers.names(), headers.codes()
         entry = dataclasses.replace(names["RCPartitionConfigs"])

@@ -15,7 +15,7 @@ nav { border-right: 1px solid var(--line); padding: 1.5rem 1rem; position: stick
 nav a { display: block; padding: .1rem 0; } nav a[aria-current] { font-weight: 600; color: inherit; }
 main { padding: 1.5rem 2rem 6rem; }
 a { color: var(--link); text-decoration: none; } a:hover { text-decoration: underline; }
-h2 { margin-top: 2.5rem; padding-top: 1rem; border-top: 1px solid var(--line); font-size: 1.2rem; }
+h1 { font-size: 1.6rem; } h2 { margin-top: 2.5rem; padding-top: 1rem; border-top: 1px solid var(--line); font-size: 1.2rem; }
 h3 { margin: 1rem 0 .2rem; font-size: .8rem; text-transform: uppercase; letter-spacing: .06em; opacity: .7; }
 pre, code { font: 13px/1.45 ui-monospace, monospace; } pre { margin: .5rem 0; overflow-x: auto; }
 pre.synopsis { background: var(--soft); padding: .7rem 1rem; border-radius: 6px; }
@@ -27,7 +27,8 @@ h2 a, tr:target code, div:target pre { color: inherit; } :target { background: v
 .part { margin-top: 3rem; font-size: 1.4rem; font-weight: 600; color: var(--link); }
 .part + h2 { border-top: 0; margin-top: .5rem; padding-top: 0; }
 .section { margin-top: 3rem; padding: .4rem 1rem; background: var(--soft); border-left: 3px solid var(--link); }
-@media (max-width: 50rem) { body { display: block; } nav { position: static; height: auto; border: 0; } }
+@media (max-width: 50rem) { body { display: block; } nav { position: static; height: auto; border: 0; padding-bottom: 0; }
+      nav a { display: inline-block; margin-right: .8rem; } main { padding: 0 1rem 3rem; } }
 """
 
 _INDEXES = (("errors", "Codes", "by code"), ("files", "Files", "by file"), ("runs", "Programs", "by program"),
@@ -65,10 +66,6 @@ class _Linker:
         return re.sub(r"\b[A-Za-z]\w{4,}\b", link, html.escape(text, quote=False))
 
 
-# What a function returns begins a line of its comment, and is looked for by itself.
-_NEW_SUBJECT = re.compile(r"\n(?=(?:Returns?|Fails|Both return|They return)\b)")
-
-
 def _prose(text, link, here=None):
     """Paragraphs filled, indented lines as they are written."""
     out = []
@@ -79,7 +76,7 @@ def _prose(text, link, here=None):
                 out.append(f"<pre>{joined}</pre>")
             else:
                 joined = re.sub(r"`([^`\n]+)`", r"<code>\1</code>", joined)
-                out += [f"<p>{part}</p>" for part in _NEW_SUBJECT.split(joined)]
+                out.append(f"<p>{joined}</p>")
     return "".join(out)
 
 
@@ -101,7 +98,8 @@ def _entry(group, page, link):
     page_name = first.family.name
     heading = ", ".join(f'<a id="{entry.name}" href="{page_name}.html#{entry.name}">{entry.name}</a>' for entry in group)
     synopsis = "\n".join(link(line, entry.name) for entry in group for line in entry.declaration(width=110))
-    out = [f"<h2>{heading}</h2><pre class=synopsis>{synopsis}</pre>", _prose(first.comment.text, link, first.name)]
+    out = [f"<h2>{heading}</h2><pre class=synopsis>{synopsis}</pre>"]
+    out += [_prose(text, link, first.name) for text in pages.split(first) if text]
     for label, items in (("Files", page.files if first.comment.fixed.get("Files") else []),
                          ("Programs", page.runs), ("Locks", page.locks)):
         if items:
@@ -114,7 +112,7 @@ def _section(text, link):
     if not text:
         return ""
     if len(text) < 40 and "\n" not in text:
-        return f'<p class="part">{html.escape(text.rstrip("."))}</p>'
+        return f'<p class="part">{html.escape(text[0].upper() + text[1:].rstrip("."))}</p>'
     return f'<div class="section">{_prose(text, link)}</div>'
 
 

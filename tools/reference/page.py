@@ -40,7 +40,8 @@ def _summary(entry):
     return text
 
 
-def _split(entry):
+def split(entry):
+    """What the comment says of what a function does, and of what it returns, which may be empty."""
     text = entry.comment.text
     found = _RESULT.search(text)
     if entry.returns == "void" or not found:
@@ -83,12 +84,19 @@ def without_tables(text):
 
 
 def _list(entry, kind):
-    return entry.comment.fixed.get(kind) or entry.family.intro.fixed.get(kind, [])
+    """The items of a fixed line, of the function or of all functions of its header."""
+    return [] if _only_releases(entry) else entry.comment.fixed.get(kind) or entry.family.intro.fixed.get(kind, [])
+
+
+def _only_releases(entry):
+    """Whether the comment is about another function, whose record this one releases."""
+    return entry.returns == "void" and any(other.name in entry.group and other.returns != "void"
+                                           for other in entry.family.names)
 
 
 def _errors(entry, known):
     errors = {}
-    if entry.kind == "function":
+    if entry.kind == "function" and entry.returns != "void":
         errors = _table(entry.comment.text)
         for item in entry.comment.fixed.get("Errors", []):
             code, _, said = item.partition(" ")
@@ -105,9 +113,7 @@ def _errors(entry, known):
 
 
 def _files(entry):
-    found = list(_list(entry, "Files"))
-    if not found:
-        found = _PATH.findall(entry.comment.text) + _PATH.findall(entry.family.intro.text)
+    found = _list(entry, "Files") or ([] if _only_releases(entry) else _PATH.findall(entry.comment.text))
     return list(dict.fromkeys(path.rstrip(".") for path in found))
 
 
@@ -137,7 +143,7 @@ def _shared_result(entry):
 
 
 def page_of(entry, names, known_codes):
-    description, result = _split(entry)
+    description, result = split(entry)
     if entry.returns != "void" and entry.kind == "function":
         if not result or result.startswith("Fails"):
             shared = _shared_result(entry)
