@@ -1,5 +1,5 @@
 /*
- * What the rest of the appliance tells the library: the model's limits and the hardware around it.
+ * Facts about the rest of the appliance: the model's limits and the hardware around it.
  *
  * /etc.defaults/tavoinfo.conf lists the model's capabilities and never changes after manufacture. Expansion units are
  * found in /sys. Nothing is locked, nothing is cached.
@@ -54,10 +54,10 @@ TAVO_API unsigned long RAIDSizeLimitGet(void);
 /* Renames and removes users and groups in the user lists of Samba's settings, /usr/tavo/etc/smb.conf: "valid users",
  * "invalid users", "read list", "write list" and "admin users" of every section. pshNames maps upper-case old names to
  * new names, "" removing the name; a key that begins with "@" is a group, which the file writes as "@name" or "+name".
- * Everything else in the file stays as it is, byte for byte. Hold the Samba lock.
+ * The rest of the file stays unchanged, byte for byte. Hold the Samba lock.
  * Returns 0 also when there is no such file, or -1 with
  *   ERR_BAD_PARAMETERS  pshNames is NULL
- *   ERR_OPEN_FAILED, ERR_READ_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED  the file, which is as it was
+ *   ERR_OPEN_FAILED, ERR_READ_FAILED, ERR_WRITE_FAILED, ERR_RENAME_FAILED  the file, which is unchanged
  * Files: /usr/tavo/etc/smb.conf */
 TAVO_API int TAVOUserModifySmbConf(const TLIBSZHASH *pshNames);
 

@@ -1,5 +1,5 @@
 /*
- * Disks: which there are, where they sit, what they are, and their power state.
+ * Disks: listing them, their places, their properties and their power state.
  *
  * A disk is "/dev/sd" and one letter (an internal bay or an external port) or two (the unit letter and the disk letter
  * of an expansion unit); a partition appends its decimal number. Functions that take a path accept exactly these names,

@@ -16,7 +16,7 @@
  * after a dot), is synced to disk, gets the owner, group, permission bits and extended attributes of the old file, and
  * is renamed over it. A crash leaves the old file or the new one. A symbolic link is followed and stays a link, except
  * in a directory that everybody may write to (/tmp), where writers refuse it with ERR_OPEN_FAILED; a hard link is cut.
- * After a failure the old file is as it was and the temporary file is gone. A new file has mode 0644, whatever the
+ * After a failure the old file is unchanged and the temporary file removed. A new file has mode 0644, whatever the
  * umask. The codes of a rewrite are
  *   ERR_OPEN_FAILED     the file cannot be opened or is not a regular file, or the temporary file cannot be created
  *   ERR_STAT_FAILED     the state of the open file cannot be read

@@ -33,7 +33,7 @@
 
 TAVO_BEGIN_DECLS
 
-/* What TAVOGroupEnum lists. */
+/* The groups that TAVOGroupEnum lists. */
 enum {
     TAVO_GROUP_LOCAL = 0x1, /* local groups */
     TAVO_GROUP_DOMAIN = 0x2 /* domain groups */
@@ -51,7 +51,7 @@ enum { TAVO_GROUP_GID_MIN = 65536, TAVO_GROUP_GID_MAX = 95536 };
 
 /* One group. A single block: release it with TAVOGroupFree only. */
 typedef struct TAVOGROUP {
-    char *szName;      /* as it was typed */
+    char *szName;      /* as typed */
     int32_t nGid;      /* -1 when passed in: choose one (add), keep it (change) */
     char **rgszMember; /* names of users, NULL at the end; when passed in NULL means none */
     int32_t nKind;     /* one of TAVO_GROUP_KIND_ */

@@ -60,7 +60,7 @@ TAVO_API void TLIBSzHashFree(TLIBSZHASH *pHash);
 TAVO_API char *SzTLIBSzHashGetValue(const TLIBSZHASH *pHash, const char *szKey);
 
 /* Sets the value of szKey to a copy of szValue, adding the key when it is missing.
- * Returns the pair's slot; -1, without a code and with the hash as it was: an argument or *ppHash is NULL, or the hash
+ * Returns the pair's slot; -1, without a code and with the hash unchanged: an argument or *ppHash is NULL, or the hash
  * cannot grow. */
 TAVO_API int TLIBSzHashSetValue(TLIBSZHASH **ppHash, const char *szKey, const char *szValue);
 

@@ -44,7 +44,7 @@ typedef struct TLIBSZLIST {
                       until the list grows or is emptied */
     int32_t fMode; /* a TLIB_SZLIST_ mode; any other value that was passed to TLIBSzListSortItems: not sorted */
     char *EndofFree; /* lowest address in use by a string; strings are packed downward from the end of the block */
-    char *pszEmpty;  /* the block's last byte, always 0: what the slot of a hole points to */
+    char *pszEmpty;  /* the block's last byte, always 0; the slot of a hole points to it */
     __extension__ char *pszItem[]; /* nItem pointers to strings in this block */
 } TLIBSZLIST;
 

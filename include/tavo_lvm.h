@@ -47,7 +47,7 @@ typedef struct LVMVGLIST {
     struct LVMVGLIST *pNext;
 } LVMVGLIST;
 
-/* What LVMVgSBListSearch looks for; either may be NULL. */
+/* The key of LVMVgSBListSearch; either pointer may be NULL. */
 typedef struct LVMVGKEY {
     const char *szVg;
     const char *szPv;

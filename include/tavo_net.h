@@ -190,7 +190,7 @@ TAVO_API int TAVONetHostsRefresh(void);
  * Files: /etc/network.undo */
 TAVO_API int TAVONetCheckpointTake(void);
 
-/* Ends the checkpoint and keeps the network as it is. Any process may do that. ERR_FILE_NOT_FOUND: there is
+/* Ends the checkpoint and keeps the present network. Any process may do that. ERR_FILE_NOT_FOUND: there is
  * none, or its process has died and the network has just been restored. ERR_REMOVE_FAILED: it could not be removed.
  * Files: /etc/network.undo */
 TAVO_API int TAVONetCheckpointEnd(void);

@@ -54,8 +54,9 @@ extern TAVO_API const PARTTYPE PartType[49];
 /* The layout version of new disks when no other version is recognised. */
 enum { PARTITION_VERSION_CURRENT = 7 };
 
-/* What PartitionCreate makes. Create the two in two calls, system first: with both flags only the data partition is
- * made, and PARTITION_SYSTEM writes an empty table first, so that an existing data partition is removed. */
+/* The partitions that PartitionCreate makes. Create the two in two calls, system first: with both flags only the data
+ * partition is made, and PARTITION_SYSTEM writes an empty table first, so that an existing data partition is removed.
+ * */
 enum {
     PARTITION_SYSTEM = 1, /* partitions 1 and 2; for PartitionClean too */
     PARTITION_DATA = 2    /* partition 3; for PartitionClean partitions 3 to 15 */
@@ -64,7 +65,7 @@ enum {
 /* Results of PartitionTableTypeGet. */
 enum { PARTITION_TABLE_NONE = 1, PARTITION_TABLE_MBR = 2, PARTITION_TABLE_GPT = 3 };
 
-/* What PartitionPathEnum looks for. */
+/* The filter of PartitionPathEnum. */
 typedef struct PARTITIONFILTER {
     const char *szPrefix; /* of the kernel name: "sda"; NULL or "" for any */
     int32_t fContainer;   /* DISK_CONTAINER_ bits of tavo_disk.h; 0 for any */

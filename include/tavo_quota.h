@@ -15,13 +15,13 @@
 
 TAVO_BEGIN_DECLS
 
-/* What TAVOQuotaGet reports. */
+/* The result of TAVOQuotaGet. */
 typedef struct TAVOQUOTA {
     float rLimit;    /* megabytes; 0 without a limit */
     uint64_t cbUsed; /* bytes in use */
 } TAVOQUOTA;
 
-/* What TAVOUnitTrans does with a value. */
+/* The conversions of TAVOUnitTrans. */
 enum {
     TAVO_UNIT_MB_TO_BYTE = 0,
     TAVO_UNIT_BYTE_TO_MB = 1,

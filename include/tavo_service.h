@@ -33,7 +33,7 @@ struct TAVOSERVICE {
     int32_t rgShareId[4]; /* its data folders, in the order in which they are bound; ended by 12 */
 };
 
-/* What rgShareId ends with. */
+/* The value that ends rgShareId. */
 #define TAVO_SERVICE_SHARE_END 12
 
 /* The data folder of a service: a row of the share table, filled in by TAVOServiceSettingGet. */

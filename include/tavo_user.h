@@ -30,7 +30,7 @@
 
 TAVO_BEGIN_DECLS
 
-/* What TAVOUserEnum lists. */
+/* The accounts that TAVOUserEnum lists. */
 enum {
     TAVO_USER_LOCAL = 0x1,      /* local accounts */
     TAVO_USER_DOMAIN = 0x2,     /* domain accounts */
@@ -58,7 +58,7 @@ enum {
 /* One user. A single block: release it with TAVOUserFree only. No string is NULL in a record that the library filled.
  */
 typedef struct TAVOUSER {
-    char *szName;             /* as it was typed */
+    char *szName;             /* as typed */
     char *szPasswd;           /* the hash of the shadow file; for TAVOUserSet, that hash (the password stays unchanged)
                                   or a new password in clear text */
     int32_t nUid;             /* -1 when passed in: choose one (add), keep it (change) */
@@ -207,7 +207,7 @@ TAVO_API int TAVOUserSetOne(const char *szOldName, const TAVOUSER *pUser);
 
 /* Stores hashes that were computed elsewhere: rgszHash for the shadow file, rgszLmHash and rgszNtHash (32 hexadecimal
  * digits each) for Samba. Only the name of a record is used. An entry with a NULL record, name or hash is skipped; an
- * entry that fails is logged and skipped. Everything else about the account stays as it is.
+ * entry that fails is logged and skipped. Everything else about the account stays unchanged.
  * Returns 0, or -1 with ERR_BAD_PARAMETERS (an array is NULL, nUser is negative) or as TAVOUserSet.
  * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*,
  *   /etc/.tavoaccount.commit

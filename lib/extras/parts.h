@@ -23,8 +23,8 @@ void *OpenBtree(const char *path, int flags, int mode, bool parameters) noexcept
 int CloseBtree(void *store) noexcept;
 void SyncBy(int (*sync)(int fd)) noexcept;
 
-// While one of these lives, the database opens, closes and allocates through us: without memory for its environment it would
-// crash, a file that cannot be closed it closes twice, and one that cannot be set up it leaves open.
+// While one of these lives, the database opens, closes and allocates through us: without memory for its environment it
+// would crash, a file that cannot be closed it closes twice, and one that cannot be set up it leaves open.
 class DatabaseCall {
   public:
     DatabaseCall() noexcept;
@@ -32,9 +32,9 @@ class DatabaseCall {
     DatabaseCall(const DatabaseCall &) = delete;
     DatabaseCall &operator=(const DatabaseCall &) = delete;
 
-    bool Reserve() noexcept;          // what an open needs to fail as it should; false without memory
+    bool Reserve() noexcept;          // memory for a failing open; false when there is none
     int CloseError() const noexcept;  // of a file that was closed; 0 for none
-    void CloseLeft() noexcept;        // what was opened and not closed
+    void CloseLeft() noexcept;        // closes files that are still open
 
   private:
     bool is_owner_;

@@ -1,4 +1,5 @@
-// What the database calls in place of the C library. It has two interfaces whose headers cannot be included together.
+// The functions that the database calls in place of the C library. It has two interfaces whose headers cannot be
+// included together.
 #include "extras/parts.h"
 
 #include <algorithm>
@@ -16,13 +17,13 @@
 namespace tavo::extras {
 namespace {
 
-// An environment is what the database allocates first for an open, in two pieces. When it cannot have the second one its
-// clean-up reads through the pointer to it, so both are set aside before.
+// An environment is what the database allocates first for an open, in two pieces. When it cannot have the second one
+// its clean-up reads through the pointer to it, so both are set aside before.
 constexpr size_t kPieceOfEnvironment = 8 << 10;
 static_assert(sizeof(DB_ENV) <= kPieceOfEnvironment);
 
-// The thread whose calls are seen to; 0 when there is none. What the database calls is one for the whole program, and a
-// lock would stay locked in a child of it: of two threads at once the second one goes without.
+// The thread whose calls are replaced; 0 when there is none. The hooks are global in the program, and a lock would stay
+// locked in a child of it; so of two threads at once, the second one's calls are not replaced.
 constinit std::atomic<pid_t> owner = 0;
 
 constinit void *spares[2] = {nullptr, nullptr};
@@ -62,8 +63,8 @@ int OpenNoted(const char *path, int flags, ...) noexcept
     return fd;
 }
 
-// The system has closed the file, whatever it says. The database would close the number again, which may be somebody
-// else's by then, or crash over what it has freed.
+// The system has closed the file even when it reports an error. The database would close the number again, which may
+// belong to another file by then, or crash on freed memory.
 int CloseOnce(int fd) noexcept
 {
     const bool mine = IsOwner();

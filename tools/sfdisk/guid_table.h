@@ -1,5 +1,5 @@
-// GUID partition tables, for disks that are larger than an MS-DOS table can describe. libfdisk reads and writes them: both
-// headers with their checksums, and the protective MS-DOS table.
+// GUID partition tables, for disks that are larger than an MS-DOS table can describe. libfdisk reads and writes them:
+// both headers with their checksums, and the protective MS-DOS table.
 #ifndef SFDISK_GUID_TABLE_H
 #define SFDISK_GUID_TABLE_H
 
@@ -13,16 +13,16 @@ struct fdisk_context;
 
 namespace sfdisk {
 
-// Whether a disk has so many sectors that it gets such a table.
+// Returns whether a disk has so many sectors that it gets such a table.
 inline bool NeedsGuidTable(const BlockTarget &disk)
 {
     return disk.Sectors() > kAddressableSectors;
 }
 
-// Whether the first sector says that the disk has such a table.
+// Returns whether the first sector says that the disk has such a table.
 bool HasGuidTable(const BlockTarget &disk);
 
-// Whether a sector is the header of such a table, in order or not.
+// Returns whether a sector is the header of such a table, in order or not.
 bool IsGuidHeader(const Sector &sector);
 
 class GuidTable {

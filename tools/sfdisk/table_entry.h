@@ -25,7 +25,7 @@ struct TableEntry {
     uint64_t End() const { return start + count; }
 };
 
-// Whether the sector carries the signature of a table.
+// Returns whether the sector carries the signature of a table.
 bool HasSignature(const Sector &sector);
 void SetSignature(Sector &sector);
 

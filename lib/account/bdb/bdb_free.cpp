@@ -1,4 +1,4 @@
-// Releases a value that a read handed out.
+// Releases a value that a read returned.
 #include "tavo_bdb.h"
 
 #include <cstdlib>

@@ -100,7 +100,7 @@ int AccountCommit::Commit()
     const bool follows = marker_.HasMoreThanFiles();
     if (!follows && marker_.files.empty())
         return 0;
-    // The accounts first: what they are does not depend on what neighbours know of them.
+    // The accounts first: they do not depend on the neighbours' files.
     std::stable_partition(marker_.files.begin(), marker_.files.end(),
                           [](const FileStep &file) { return file.target == kAccountFile; });
     return !follows && marker_.files.size() == 1 ? CommitOne() : CommitAll();
@@ -135,7 +135,7 @@ bool AccountCommit::MoveAll(bool &moved)
     return true;
 }
 
-// From the marker on nothing takes memory: what it promises is kept at once, or it goes again.
+// From the marker on nothing allocates memory: the change is completed at once, or the marker is removed again.
 int AccountCommit::CommitAll()
 {
     const std::string text = FormatMarker(marker_);

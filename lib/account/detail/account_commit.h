@@ -1,8 +1,8 @@
-// Replaces everything that one change touches together: the text files of users and groups, and the neighbours' files in
-// which names stand. Each new file is written and synced beside the old one; then the marker, which names them all and
-// what follows, is made durable, they are moved into place one by one, and the marker goes. A death before the marker leaves
-// the old files, one after it is finished by the next caller: never some of each.
-// A file that would become what it is stays. Where only one changes, moving it into place is all or nothing by itself.
+// Replaces all files of one change together: the text files of users and groups, and the neighbours' files that contain
+// the names. Each new file is written and synced beside the old one. Then the marker, which lists the files and the
+// following steps, is made durable, the files are moved into place one by one, and the marker is removed. If the
+// process dies before the marker, the old files stay; if it dies later, the next caller completes the change.
+// Unchanged files are not rewritten. If only one file changes, its rename alone is atomic and needs no marker.
 #ifndef TAVO_ACCOUNT_DETAIL_ACCOUNT_COMMIT_H
 #define TAVO_ACCOUNT_DETAIL_ACCOUNT_COMMIT_H
 
@@ -20,9 +20,9 @@ namespace tavo {
 
 class AccountCommit {
   public:
-    // `carried`: what is still to be done from earlier, as ResumeCommit left it.
+    // `carried`: remaining steps of an earlier change, from ResumeCommit.
     explicit AccountCommit(Marker carried = {}) : marker_(std::move(carried)) {}
-    ~AccountCommit();  // what was not committed is removed
+    ~AccountCommit();  // removes files that were not committed
     AccountCommit(const AccountCommit &) = delete;
     AccountCommit &operator=(const AccountCommit &) = delete;
 
@@ -36,24 +36,24 @@ class AccountCommit {
     // Leaves out the files of a target after all.
     void Withdraw(unsigned target) noexcept;
 
-    // Samba's lock on its password file: to be taken before that is compared and written, and released when the stamps of
-    // the new one are recorded.
+    // Samba's lock on its password file: to be taken before that is compared and written, and released when the stamps
+    // of the new one are recorded.
     SambaLock &Samba() { return samba_; }
 
-    // What follows, for the marker.
+    // The following steps, for the marker.
     Marker &Steps() { return marker_; }
     const Marker &Steps() const { return marker_; }
 
-    // All files must have been written. 0; ERR_WRITE_FAILED or ERR_NOT_ENOUGH_SPACE with nothing moved; ERR_RENAME_FAILED
-    // with nothing moved, or with the rest left to ResumeCommit. Neighbours' files that could not be moved are pending in
-    // the steps.
+    // All files must have been written. 0; ERR_WRITE_FAILED or ERR_NOT_ENOUGH_SPACE with nothing moved;
+    // ERR_RENAME_FAILED with nothing moved, or with the rest left to ResumeCommit. Neighbours' files that could not be
+    // moved are pending in the steps.
     int Commit();
 
-    // Whether the last Commit also made its renames durable. They have taken place even if not.
+    // Returns whether the last Commit also made its renames durable. They have taken place even if not.
     bool IsSynced() const { return synced_; }
 
-    // To be called when the steps have been taken, as far as they could be: `steps` is what is left. Never fails: a marker
-    // that could not be replaced says to do again what was done, and that does nothing.
+    // To be called when the steps have been taken, as far as they could be: `steps` is what is left. Never fails: a
+    // marker that could not be replaced says to do again what was done, and that does nothing.
     void Settle() noexcept;
 
   private:

@@ -18,15 +18,15 @@ inline constexpr size_t kGroupKeySize = 128;
 // The rule that users and groups share; they differ in the greatest number of characters only.
 bool IsAccountName(const char *name, int max_chars);
 
-// "." and ".." pass that rule, but no folder of that name can be somebody's home.
+// "." and ".." pass that rule, but cannot be the names of home folders.
 bool IsDotName(std::string_view name);
 
 bool IsDomainName(std::string_view name);  // holds a backslash
 
-// What the entries of a store are: lines by names, or names by ids.
+// The kind of a store's entries: lines by names, or names by ids.
 enum class StoreContents { kLines, kIndex };
 
-// Whether an entry of a store is about a domain account. A description may hold a backslash, too.
+// Returns whether an entry of a store is about a domain account. A description may hold a backslash, too.
 bool IsDomainEntry(std::string_view key, std::string_view value, StoreContents contents);
 
 // Keys and values of the stores end in a NUL.

@@ -1,5 +1,5 @@
 // One locked use of the stores of an account family: take the locks, bring the stores up to date, open them, and, after
-// a change, seal them again. What goes wrong comes back as a code.
+// a change, seal them again. Failures are returned as codes.
 #ifndef TAVO_ACCOUNT_DETAIL_ACCOUNT_SESSION_H
 #define TAVO_ACCOUNT_DETAIL_ACCOUNT_SESSION_H
 
@@ -26,7 +26,7 @@ class AccountSession {
 
     // Opens the stores of the family that `stores` lists, under the family's lock, shared. To rebuild them
     // it takes the lock exclusively, and keeps it. A program that is not root reads the text files instead, without any
-    // lock. 0, ERR_LOCK_FAILED, ERR_OPEN_FAILED; what BuildStores says; what TextStores::Open says.
+    // lock. Returns 0, ERR_LOCK_FAILED, ERR_OPEN_FAILED, or a code of BuildStores or TextStores::Open.
     int OpenToRead(std::span<const size_t> stores);
 
     // Takes `locks` and the system's lock exclusively and opens all stores. ERR_ACCESS_DENIED to all but root.
@@ -41,13 +41,12 @@ class AccountSession {
     // Call it before the first change of a store: if the process dies between here and Seal, the stores are rebuilt.
     void BeginChange();
 
-    // The text files win over the stores for whatever this change has not touched: takes over what somebody has changed
-    // in them since the stores were opened. 0, ERR_READ_FAILED or a code of the stores.
+    // For accounts that this change does not touch the text files have precedence: takes over edits by other programs
+    // since the stores were opened. Returns 0, ERR_READ_FAILED or a code of the stores.
     int Merge();
     bool IsMerged() const;  // no text file has changed since
 
-    // What the end of a change leaves: files that were written from the stores, or, as nothing changed, those from
-    // before.
+    // The text files at the end of a change: written from the stores, or, when nothing changed, the old ones.
     enum class Texts { kWritten, kAsBefore };
 
     // Closes the stores and seals them: they and the text files agree. ERR_DB_CLOSE when a store could not be written;
@@ -72,7 +71,7 @@ class AccountSession {
     unsigned locks_ = 0;
     SystemLock system_;
     std::vector<std::unique_ptr<Btree>> stores_;
-    std::string texts_;  // what the text files that the stores were built from looked like
+    std::string texts_;  // the state of the text files from which the stores were built
 };
 
 }  // namespace tavo

@@ -30,14 +30,14 @@ int AccountTransaction::Begin(unsigned locks)
             return code;
         if (wanted == (locks | kAllLocks) || !MarkerStands())
             break;
-        session_.Unlock();  // somebody died meanwhile
+        session_.Unlock();  // a process died meanwhile
     }
     Marker earlier;
     if (MarkerStands()) {
         if (const int code = ResumeCommit(earlier))
             return code;
     }
-    // Of somebody who died before anything was decided: hashes.
+    // Temporary files of a process that died before its change was decided: they hold hashes.
     for (const StoreFamily *family : {&kUserFamily, &kGroupFamily})
         for (const TextRow &row : family->texts)
             ::unlink(row.temporary);
@@ -48,7 +48,7 @@ int AccountTransaction::Begin(unsigned locks)
     return session_.OpenAll();
 }
 
-// What is still left afterwards stays in the steps, and so in the next marker.
+// Steps that fail again stay listed, and so in the next marker.
 void AccountTransaction::FinishEarlier()
 {
     Marker &steps = commit_.Steps();
@@ -187,7 +187,7 @@ int AccountTransaction::Commit()
     }();
     if (const int code = commit_.Commit())
         return code;
-    // The change has happened. What fails from here on, for want of memory too, is left to the next one.
+    // The change has happened. Steps that fail from here on, also for lack of memory, are left to the next change.
     if (!commit_.IsSynced())
         LogError("%s:%d Failed to sync the folders of the account files, errno=%d", errno);
     try {

@@ -1,5 +1,5 @@
-// One change of users or groups with everything that follows from it: the locks, the stores, the text files, the files
-// of neighbours, the home folders. What a change that died has left to do is done first.
+// One change of users or groups with all its consequences: the locks, the stores, the text files, the files of
+// neighbours, the home folders. It first completes the steps of a change whose process died.
 #ifndef TAVO_ACCOUNT_DETAIL_ACCOUNT_TRANSACTION_H
 #define TAVO_ACCOUNT_DETAIL_ACCOUNT_TRANSACTION_H
 
@@ -18,7 +18,7 @@ namespace tavo {
 
 class AccountTransaction {
   public:
-    // What follows and fails, also of what is left from earlier changes, is logged at `where`.
+    // Failures of the following steps, including those of earlier changes, are logged at `where`.
     explicit AccountTransaction(const AccountKind &kind, Where where = Where())
         : kind_(kind), where_(where), session_(kind)
     {
@@ -32,8 +32,8 @@ class AccountTransaction {
 
     AccountSession &Session() { return session_; }
 
-    // Whether rights of somebody who had this name are still to be taken away: a new account of the name would have
-    // them.
+    // Returns whether rights of an earlier account of this name still have to be removed: a new account of the name
+    // would have them.
     bool IsPending(bool is_group, const std::string &key) const;
 
     // The planned steps of the change. `targets` of a step: the files that contain the name.
@@ -44,7 +44,7 @@ class AccountTransaction {
         return backup_;
     }
 
-    // Composes the neighbours' files for the steps in Files(). What cannot be composed is pending.
+    // Composes the neighbours' files for the steps in Files(). Files that cannot be composed are pending.
     void Compose();
 
     // Composes the account files by `compose` from stores into which everything is merged that others have changed in

@@ -79,7 +79,7 @@ class Btree : public TAVOBDB, public StoreView {
     bool changed_ = false;
     bool damaged_ = false;  // by a change that failed, perhaps halfway
     bool sealed_ = false;   // before our first change, the seal beside the store held for this file
-    std::string texts_;     // what the text files looked like then
+    std::string texts_;     // the state of the text files at that time
 };
 
 // The stored bytes of the reserved keys.

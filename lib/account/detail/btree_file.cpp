@@ -26,7 +26,7 @@ uint32_t Word(const char *page, size_t at)
     return word;
 }
 
-// What cannot be read may well be a store: it must not be removed as one that is not.
+// A file that cannot be read may be a store, so it must not be removed as a foreign file.
 BtreeFile LookAtContent(int fd, off_t size)
 {
     char page[kHeader];
@@ -120,7 +120,7 @@ bool CreateBtreeFile(const char *path, bool info, mode_t mode)
         return false;
     if (mode != 0 && ::fchmod(fd.Get(), mode) != 0)
         return false;
-    return ::link(dir.File(), path) == 0;  // not rename: what came there in between is not ours to replace
+    return ::link(dir.File(), path) == 0;  // not rename, which would replace a file created there meanwhile
 }
 
 }  // namespace tavo

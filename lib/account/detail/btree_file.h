@@ -10,11 +10,11 @@ enum class BtreeFile { missing, store, foreign, unreadable };
 
 // How the file of a store has to be.
 struct StoreAccess {
-    mode_t mode = 0;       // what it gets; 0 leaves it alone
+    mode_t mode = 0;       // the mode to set; 0 leaves it unchanged
     bool is_ours = false;  // it must belong to root, with one name and no right beyond `mode`: else it is foreign
 };
 
-// The file as it was looked at, by which it is known when it is open.
+// The state of the file before the open, by which the opened file is recognised.
 struct StoreFile {
     dev_t device = 0;
     ino_t inode = 0;

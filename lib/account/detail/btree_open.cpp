@@ -50,7 +50,7 @@ int RemoveForeign(const char *path, bool is_ours)
     return ERR_DB_OPEN;
 }
 
-// Whether the database has opened the very file that was looked at.
+// Returns whether the database has opened the very file that was looked at.
 bool IsSameFile(const Btree &store, const StoreFile &file)
 {
     const DB *db = static_cast<const DB *>(store.pDb);

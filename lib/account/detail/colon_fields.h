@@ -16,7 +16,8 @@ std::vector<std::string_view> SplitColons(std::string_view line);
 // A whole decimal number of 32 bits; a user id above 2^31 reads as the negative number that it is in a record.
 std::optional<int32_t> FieldNumber(std::string_view field);
 
-// What a field of an account line may not hold: control bytes, which end lines, and, when `colon` is set, the colon.
+// Bytes that a field of an account line may not hold: control bytes, which end lines, and, when `colon` is set, the
+// colon.
 bool FitsInField(std::string_view text, bool colon_ends_it);
 
 // Colons in free text, encoded for a line and back.

@@ -33,8 +33,7 @@ enum Target : unsigned {
     kGuestModule = 32,
 };
 
-// What tells one file from another in its folder: it changes with every change of the file. "-" for one that does not
-// exist.
+// Identifies a file and its content: it changes with every change of the file. "-" for a file that does not exist.
 std::string FileIdentity(const char *path);
 
 struct FileStep {
@@ -87,7 +86,7 @@ bool MarkerStands() noexcept;
 // ERR_READ_FAILED.
 int ReadMarker(Marker &marker);
 
-// Replaces it; with `durable` it is on the disk afterwards. False with errno, and the old one is as it was.
+// Replaces it; with `durable` it is on the disk afterwards. False with errno, the old one unchanged.
 bool WriteMarker(const std::string &text, bool durable) noexcept;
 
 void RemoveMarker() noexcept;

@@ -27,7 +27,7 @@ bool FinishNeighbour(const FileStep &file)
         return true;
     if (IsWhole(file) && now == file.before && MoveIntoPlace(file))
         return true;
-    // It was moved, and somebody has changed it since; or it was not.
+    // It was moved and edited since, or it was not moved.
     const bool moved = ::unlink(file.temporary.c_str()) != 0 && errno == ENOENT && now != file.before;
     return moved;
 }

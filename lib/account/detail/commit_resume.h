@@ -11,7 +11,8 @@ namespace tavo {
 // unchanged since. `marker` becomes what is left to do. 0, ERR_READ_FAILED or ERR_RENAME_FAILED.
 int ResumeCommit(Marker &marker);
 
-// The part of that which a reader needs: the account files. The marker stays for the next change when more follows.
+// Does only the part that a reader needs: moves the account files. The marker stays for the next change when more steps
+// follow.
 int FinishAccountFiles();
 
 // Removes the temporary files of a family, unless a commit is to be completed with them. 0 or ERR_REMOVE_FAILED.

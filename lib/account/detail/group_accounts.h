@@ -25,7 +25,7 @@ int FindGroupKey(const AccountSession &session, int32_t gid, std::string &key);
 // A description that fits into its line. "" takes the description away.
 bool IsGroupDescription(std::string_view text);
 
-// What is about to be stored for one group, complete: storing it cannot be refused any more.
+// The complete new entries of one group, already checked: storing them cannot be refused.
 struct GroupChange {
     std::string old_key;   // of the group that is replaced; empty when one is added
     std::string old_name;  // as it stood
@@ -40,7 +40,7 @@ int PrepareGroup(const TAVOGROUPDB &db, const char *old_name, const TAVOGROUP &g
 // Fails only when a store cannot be changed; then the stores are no longer to be trusted.
 int StoreGroup(const TAVOGROUPDB &db, const GroupChange &change);
 
-// ERR_GROUP_DB_DELETE or ERR_OUT_OF_MEMORY when a store cannot be changed. What is not there needs no deleting.
+// ERR_GROUP_DB_DELETE or ERR_OUT_OF_MEMORY when a store cannot be changed. Missing entries are skipped.
 int RemoveGroup(const TAVOGROUPDB &db, const std::string &key, int32_t gid);
 
 }  // namespace tavo

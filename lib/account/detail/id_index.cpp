@@ -8,7 +8,7 @@
 namespace tavo {
 namespace {
 
-// The id in the greatest key: what a store without the reserved key hands out next follows that.
+// The id in the greatest key: without the reserved key, the next id follows it.
 int LastId(Btree &index, int32_t &id)
 {
     std::string_view key;

@@ -1,4 +1,4 @@
-// The index of accounts by id, and the id that is handed out next. Users and groups have one each.
+// The index of accounts by id, and the next id to assign. Users and groups have one each.
 #ifndef TAVO_ACCOUNT_DETAIL_ID_INDEX_H
 #define TAVO_ACCOUNT_DETAIL_ID_INDEX_H
 
@@ -18,14 +18,14 @@ int FindKeyById(const StoreView &index, StoreView &names, int32_t id, bool (*has
                 std::string &key);
 
 struct IdRange {
-    std::string_view current_key;  // where the last id handed out is kept
+    std::string_view current_key;  // holds the id assigned last
     int32_t first;
     int32_t last;
     int full;  // the code when every id is taken
 };
 
-// The id handed out last, for the first line of a text file. Without a record of it `id` stays. 0 or a code of the
-// store.
+// Reads the id assigned last, for the first line of a text file. Without a record of it `id` stays unchanged. Returns 0
+// or a code of the store.
 int ReadLastId(const Btree &index, std::string_view current_key, int32_t &id);
 
 // Finds the next free id after the one assigned last, and then from the beginning of the range. Returns 0,

@@ -31,13 +31,13 @@ std::string_view LineOf(std::string_view value);
 // A line end inside a line would make an account of its own of what follows it.
 bool IsOneLine(std::string_view line);
 
-// Every account, those that share an id with another one too. ERR_FORMAT_ERROR when a store holds what is none.
+// Reads every account, also those that share an id with another one. ERR_FORMAT_ERROR when an entry is not an account.
 int CollectAccounts(Btree &index, Btree &names, const AccountLines &lines, AccountKeys &keys,
                     std::vector<IndexedAccount> &accounts);
 
-// What becomes of the lines of a text file that is written whole from the stores.
+// The lines of a text file that is rewritten from the stores.
 struct FileReview {
-    std::string lost;  // an account that would be gone without anybody having deleted it; empty for none
+    std::string lost;                  // an account that would be lost without having been deleted; empty for none
     std::vector<std::string> dropped;  // how lines begin that are not accounts and are not written again
 };
 

@@ -1,4 +1,4 @@
-// /etc/tavouser.conf: what the other files have no place for.
+// /etc/tavouser.conf: facts that do not fit into the other files.
 #ifndef TAVO_ACCOUNT_DETAIL_MISC_LINE_H
 #define TAVO_ACCOUNT_DETAIL_MISC_LINE_H
 
@@ -24,7 +24,7 @@ int ParseMiscLine(std::string_view text, MiscLine &line);
 
 std::string FormatMiscLine(const MiscLine &line);
 
-// The first line of a file that carries the id handed out last: "#$_@UID__INDEX@_$1024$\n".
+// The first line of a file, which holds the id assigned last: "#$_@UID__INDEX@_$1024$\n".
 std::string FormatMarkerLine(std::string_view marker, int32_t id);
 std::optional<int32_t> ParseMarkerLine(std::string_view line, std::string_view marker);
 

@@ -19,7 +19,8 @@ class NameLines {
     // False when the file is there and cannot be read. A missing one has no lines.
     bool Read();
 
-    // What `change` makes of each line of `name`, line ends included; "" takes one out. True when there was one.
+    // Replaces each line of `name` by the result of `change`, line ends included; "" removes it. Returns whether there
+    // was one.
     bool Change(const std::string &name, const std::function<std::string(std::string_view line)> &change);
 
     void Append(const std::string &line);

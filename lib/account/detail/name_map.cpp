@@ -1,4 +1,4 @@
-// What becomes of names that stand elsewhere on the appliance.
+// The renames and deletions to apply to names elsewhere on the appliance.
 #include "account/detail/name_map.h"
 
 #include "account/detail/account_name.h"

@@ -1,4 +1,4 @@
-// What becomes of names that stand elsewhere on the appliance, after any number of renames and deletions.
+// The renames and deletions to apply to names elsewhere on the appliance, any number of them combined.
 #ifndef TAVO_ACCOUNT_DETAIL_NAME_MAP_H
 #define TAVO_ACCOUNT_DETAIL_NAME_MAP_H
 
@@ -16,7 +16,7 @@ class NameMap {
     // account has the rights of two.
     void Add(const NameStep &step);
 
-    // The new name, "" for a deleted one, nullptr for one that is as it was. Groups have "@" before their name.
+    // The new name, "" for a deleted one, nullptr for an unchanged one. Groups have "@" before their name.
     const std::string *Find(std::string_view name) const;
 
     bool IsEmpty() const { return names_.empty(); }

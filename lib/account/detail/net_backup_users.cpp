@@ -27,7 +27,7 @@ bool NetBackupUsers::Set(const std::string &old_name, const std::string &name, c
         return true;
     if (!secrets_.Read())
         return false;
-    // A line end in the password would make a line of whatever follows it, such as somebody else's credentials.
+    // A line end in the password would begin a new line, such as credentials for another user.
     if (password && std::string_view(password).find_first_of("\r\n") != std::string_view::npos) {
         secrets_.Change(ServiceName(before), Nothing);
         return false;
@@ -54,7 +54,7 @@ bool NetBackupUsers::Remove(const std::string &name)
     return true;
 }
 
-// The secrets of somebody who is authorised no more go first.
+// The secrets of a user who loses the authorisation are removed first.
 int NetBackupUsers::Compose(unsigned target, AccountCommit &commit)
 {
     const int code = secrets_.Compose(target, 0600, commit);

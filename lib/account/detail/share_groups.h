@@ -10,10 +10,11 @@
 
 namespace tavo {
 
-// "@" and the upper-case old name to the new name, "" taking the group out. Everything else in the file is the same text.
+// "@" and the upper-case old name to the new name, "" taking the group out. Everything else in the file is the same
+// text.
 std::string ChangeShareGroups(std::string_view text, const TLIBSZHASH *names);
 
-// Does that in the file. 0, also when there is none; a code of the rewrite, and the file is as it was.
+// Makes these changes in the file. Returns 0, also when there is no file; or a code of the rewrite, the file unchanged.
 int ChangeGroupsInShares(const TLIBSZHASH *names);
 
 }  // namespace tavo

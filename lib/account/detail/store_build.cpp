@@ -23,8 +23,8 @@ struct CloseFolder {
     void operator()(DIR *folder) const noexcept { ::closedir(folder); }
 };
 
-// Root's folders of the mode that mkdtemp gives, in which stores were built by those who died over it. Somebody may
-// have filled /tmp, so the search ends somewhere.
+// Removes build folders (root's, with the mode of mkdtemp) of processes that died. The search is limited, because
+// another user may have filled /tmp.
 void RemoveLeftFolders(const StoreFamily &family)
 {
     constexpr int most = 4096;
@@ -149,7 +149,7 @@ int BuildStores(const AccountKind &kind, std::string &texts)
     if (!ReadContent(kind, content))
         return ERR_READ_FAILED;
     for (size_t i = 0; i < domain.size(); ++i)
-        content.stores[i].merge(domain[i]);  // what the text files have wins
+        content.stores[i].merge(domain[i]);  // the text files have precedence
     RemoveLeftFolders(family);
     const BuildFolder folder(family);
     if (!folder)

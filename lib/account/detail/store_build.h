@@ -16,7 +16,8 @@ struct AccountKind {
     size_t name_store;  // the places of two of its stores: that of the accounts, and the index by id
     size_t id_store;
     size_t key_size;
-    std::vector<StoreEntries> (*entries)(std::span<const std::string> texts);  // what the text files make of the stores
+    std::vector<StoreEntries> (*entries)(
+        std::span<const std::string> texts);  // the entries of the stores, from the text files
 };
 
 inline StoreContents ContentsOf(const AccountKind &kind, size_t store)
@@ -24,13 +25,13 @@ inline StoreContents ContentsOf(const AccountKind &kind, size_t store)
     return store == kind.id_store ? StoreContents::kIndex : StoreContents::kLines;
 }
 
-// What a caller learns of stores that cannot be opened or built: want of memory or space, else ERR_OPEN_FAILED.
+// The caller's code for stores that cannot be opened or built: lack of memory or space, else ERR_OPEN_FAILED.
 inline int CodeOfStores(int code)
 {
     return code == ERR_NOT_ENOUGH_SPACE || code == ERR_OUT_OF_MEMORY ? code : int{ERR_OPEN_FAILED};
 }
 
-// What the text files make of the stores. False when one is there but cannot be read.
+// Computes the entries of the stores from the text files. False when a file exists but cannot be read.
 bool ReadContent(const AccountKind &kind, StoreContent &out);
 
 // Completes a half-done commit, reads the text files and puts new stores in place of the old ones, whatever those are;

@@ -1,4 +1,4 @@
-// What the stores of a family hold, before it is in files: the result of reading the text files.
+// The content of a family's stores, before it is in files: the result of reading the text files.
 #ifndef TAVO_ACCOUNT_DETAIL_STORE_CONTENT_H
 #define TAVO_ACCOUNT_DETAIL_STORE_CONTENT_H
 

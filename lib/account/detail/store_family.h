@@ -27,7 +27,7 @@ struct TextRow {
 };
 
 struct StoreFamily {
-    const char *prefix;  // what the names of all store files of the family begin with
+    const char *prefix;  // the names of all store files of the family begin with it
     const char *seal;    // the record that the stores match the text files
     std::span<const StoreRow> stores;
     std::span<const TextRow> texts;  // in the order in which they are moved into place

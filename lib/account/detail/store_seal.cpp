@@ -50,7 +50,7 @@ bool AddLine(std::string &text, const char *path, bool may_be_missing)
     return true;
 }
 
-// What a seal says of the stores; empty when they are incomplete.
+// The seal's part about the stores; empty when they are incomplete.
 std::string StoresText(const StoreFamily &family)
 {
     std::string text = RunOfTheMachine();
@@ -60,7 +60,7 @@ std::string StoresText(const StoreFamily &family)
     return text;
 }
 
-// What a seal that holds says; empty when there can be none.
+// The content of a matching seal; empty when there can be none.
 std::string SealText(const StoreFamily &family, const std::string &texts)
 {
     const std::string stores = StoresText(family);

@@ -1,4 +1,4 @@
-// What a look-up sees of a store: the btree file, or, for a program without root's rights, the same entries made from the
+// A store as look-ups read it: the btree file, or, for a program without root's rights, the same entries made from the
 // text files.
 #ifndef TAVO_ACCOUNT_DETAIL_STORE_VIEW_H
 #define TAVO_ACCOUNT_DETAIL_STORE_VIEW_H
@@ -25,8 +25,8 @@ class StoreView {
     virtual int Walk(Entry which, std::string_view &key, std::string_view &value) = 0;
 };
 
-// A store that cannot be read says nothing about what is in it: 0 when the key is absent, `present` when it is there, else
-// the code of the failure.
+// A store that cannot be read says nothing about what is in it: 0 when the key is absent, `present` when it is there,
+// else the code of the failure.
 inline int RequireAbsent(const StoreView &store, std::string_view key, int present)
 {
     std::string_view value;
@@ -34,7 +34,7 @@ inline int RequireAbsent(const StoreView &store, std::string_view key, int prese
     return code == 0 ? present : code == ERR_KEY_NOT_FOUND ? 0 : code;
 }
 
-// An absent line leaves the record as it is.
+// An absent line leaves the record unchanged.
 template <class Line>
 int ReadOptional(const StoreView &store, std::string_view key, int (*parse)(std::string_view, Line &), Line &line)
 {

@@ -13,7 +13,7 @@ class SystemLock {
     SystemLock(const SystemLock &) = delete;
     SystemLock &operator=(const SystemLock &) = delete;
 
-    // Tries until `seconds` have passed; false when somebody else still holds it, or there is no /etc to lock in.
+    // Tries until `seconds` have passed; false when another process still holds it, or there is no /etc to lock in.
     bool Take(int seconds) noexcept;
     void Release() noexcept;
 

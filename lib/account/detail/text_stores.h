@@ -17,8 +17,8 @@ class TextStores {
   public:
     explicit TextStores(const AccountKind &kind) : kind_(kind) {}
 
-    // Reads the files of these stores, and the one that says which accounts there are. A store of secrets can be asked for:
-    // what it is asked then is refused with ERR_ACCESS_DENIED. 0, ERR_ACCESS_DENIED or ERR_READ_FAILED.
+    // Reads the files of these stores, and the one that says which accounts there are. A store of secrets can be
+    // requested; look-ups in it then fail with ERR_ACCESS_DENIED. 0, ERR_ACCESS_DENIED or ERR_READ_FAILED.
     int Open(std::span<const size_t> stores);
 
     StoreView *View(size_t index) const { return views_[index].get(); }

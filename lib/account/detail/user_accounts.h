@@ -28,13 +28,13 @@ int ReadPasswdLine(const TAVOUSERDB &db, std::string_view key, PasswdLine &line)
 // Fills a record from the stores name, shadow and misc. ERR_NO_SUCH_USER; codes of TAVOUserAlloc.
 int ReadUser(const AccountSession &session, std::string_view key, TAVOUSER **user);
 
-// The privilege bits by the stores name and misc: what a record says. ERR_NO_SUCH_USER.
+// The privilege bits of a record, from the stores name and misc. ERR_NO_SUCH_USER.
 int ReadPrivilege(const AccountSession &session, std::string_view key, int32_t &privilege);
 
 // The key of the account with this user id: ERR_NO_SUCH_USER when there is none.
 int FindUserKey(const AccountSession &session, int32_t uid, std::string &key);
 
-// What is about to be stored for one account, complete: storing it cannot be refused any more.
+// The complete new entries of one account, already checked: storing them cannot be refused.
 struct UserChange {
     std::string old_key;   // of the account that is replaced; empty when one is added
     std::string old_name;  // as it stood

@@ -13,12 +13,12 @@
 
 namespace tavo {
 
-// What adding, changing and deleting users takes, and tells.
+// The locks for adding, changing and deleting users, and the signals afterwards.
 inline constexpr unsigned kUserChangeLocks = TAVO_LOCK_USER | TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
 inline constexpr int kReadAccountsAgain = 10;  // for the download scheduler
 inline constexpr int kAccountsChanged = 47;    // for the event daemon
 
-// What the rest of the system has to follow up for an entry that was applied.
+// The consequences of an applied entry for the rest of the system.
 struct DoneUser {
     std::string name;
     std::string old_name;  // empty: added

@@ -11,7 +11,7 @@
 
 namespace tavo {
 
-// Whether a name is wanted, by its upper-case key without the NUL.
+// Decides whether a name is listed, by its upper-case key without the NUL.
 using KeyFilter = std::function<bool(std::string_view key)>;
 
 // The names that `flags` (TAVO_USER_) select and the filter passes, in the order in which they are to be listed.

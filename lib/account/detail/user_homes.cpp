@@ -93,7 +93,7 @@ HomeResult MakeHome(const HomeStep &step)
                : HomeResult::kFailed;
 }
 
-// Whether the folder of a step is still to be moved: kDone when it is not there any more.
+// Checks whether the folder of a step still has to be moved. Returns kDone when it does not exist any more.
 std::optional<HomeResult> WithoutFolder(const Fd &homes, const HomeStep &step)
 {
     const uint64_t inode = InodeOf(homes, step.name);

@@ -19,8 +19,8 @@ struct HomePlan {
     void Unknown(std::string name);  // unless errno says that there is none
 };
 
-// The steps for users that were added and renamed: none unless the appliance has home folders. A folder is known by its
-// inode, so that a step that is taken twice, or late, never takes somebody else's.
+// The steps for users that were added and renamed: none unless the appliance has home folders. A folder is identified
+// by its inode, so that a repeated or late step never moves another user's folder.
 HomePlan PlanHomes(std::span<const DoneUser> done, Marker &marker);
 
 // The steps for users that are deleted: their folders go to a staging folder on the same volume.
@@ -35,8 +35,8 @@ enum class HomeResult {
 // One step by one rename or mkdir.
 HomeResult TakeHomeStep(const HomeStep &step, const std::vector<std::string> &stages);
 
-// What takes its time: moves a folder from another file system, removes a staging folder with what is in it (false when
-// that fails; true when somebody else is at it, with `theirs`).
+// The slow steps: moves a folder from another file system, removes a staging folder with its contents (false when that
+// fails; true when another process is doing it, with `theirs`).
 bool MoveHomeElsewhere(const HomeStep &step, const std::vector<std::string> &stages);
 bool RemoveStage(const std::string &path, bool &theirs);
 

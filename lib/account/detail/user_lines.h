@@ -14,9 +14,9 @@ struct UserLines {
     std::string samba;  // empty when the account has none
 };
 
-// Reads the lines of an account, has them edited, and commits what differs, as one change with its locks and what follows
-// from it. A code of the edit, of AccountTransaction::Begin, ERR_INVALID_USERNAME, ERR_NO_SUCH_USER (also for accounts of a
-// domain and without a shadow line) leaves everything as it was. Reports at `where`: 0 or -1.
+// Reads the lines of an account, has them edited, and commits the differences, as one change with its locks and
+// consequences. A code of the edit, of AccountTransaction::Begin, ERR_INVALID_USERNAME, ERR_NO_SUCH_USER (also for
+// accounts of a domain and without a shadow line) leaves everything unchanged. Reports at `where`: 0 or -1.
 int ChangeUserLines(const char *name, const std::function<int(UserLines &)> &edit, Where where = Where());
 
 }  // namespace tavo

@@ -18,8 +18,8 @@ constexpr unsigned kLocksOfDelete = TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
 
 using Deleted = std::map<std::string, std::string>;  // key to name
 
-// Deletes one group; what goes wrong is logged and stays in the error state. False when the stores can no longer be trusted:
-// then nothing of the call may be kept.
+// Deletes one group; a failure is logged and stays in the error state. False when the stores may be damaged: then the
+// whole call is discarded.
 bool DeleteOne(const TAVOGROUPDB &db, const char *name, Deleted &deleted)
 {
     if (name && tavo::IsDomainName(name))

@@ -1,4 +1,4 @@
-// Takes away the limits of users on one volume.
+// Removes the limits of users on one volume.
 #include "tavo_quota.h"
 
 #include "core/detail/fault.h"

@@ -1,4 +1,4 @@
-// Takes away the limits of users on every volume that has quotas.
+// Removes the limits of users on every volume that has quotas.
 #include "tavo_quota.h"
 
 #include "account/detail/quota_volumes.h"

@@ -80,7 +80,7 @@ void TellServices(const std::vector<Doomed> &doomed)
             tavo::EndSmbConnections(user.name);
 }
 
-// What else on the appliance knows these users.
+// The other parts of the appliance that know these users.
 void PlanRemoval(const std::vector<Doomed> &doomed, tavo::AccountTransaction &change)
 {
     const tavo::KeepFault keep;

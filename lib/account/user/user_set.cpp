@@ -35,7 +35,7 @@ void SetCredentials(const std::vector<tavo::DoneUser> &done, tavo::NetBackupUser
             LogError("%s:%d Failed to set the network backup credentials of [%s]", user.name);
 }
 
-// What else on the appliance knows these users.
+// The other parts of the appliance that know these users.
 void PlanFollowUp(const std::vector<tavo::DoneUser> &done, tavo::AccountTransaction &change)
 {
     const bool has_backup = tavo::ReadSetting(tavo::kFactorySettings, "netbkp", "yes").value_or(false);

@@ -8,13 +8,13 @@ namespace tavo {
 
 inline constexpr int kPorts = 26;
 
-// Whether /sys shows the machine's disk ports at all.
+// Returns whether /sys shows the machine's disk ports at all.
 bool CanSeePorts();
 
 // Ports count from 0 here and from 1 in the kernel.
 bool HasPortMultiplier(int port);
 
-// Whether the link to the unit has a speed. A unit that is switched off stays listed until the next start.
+// Returns whether the link to the unit has a speed. A unit that is switched off stays listed until the next start.
 bool HasLink(int port);
 
 // Fills in the disks of a unit: "/dev/sd", the unit's letter and the disk's.

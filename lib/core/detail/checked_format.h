@@ -14,7 +14,7 @@ enum class ArgKind { text, number };
 template <class Arg>
 inline constexpr ArgKind kArgKind = std::is_integral_v<Arg> || std::is_enum_v<Arg> ? ArgKind::number : ArgKind::text;
 
-// What the compiler prints when a format does not fit: these are not constexpr, so reaching one ends the compilation.
+// The compiler names these when a format does not fit: they are not constexpr, so reaching one ends the compilation.
 void FormatHasMoreConversionsThanArguments();
 void FormatHasFewerConversionsThanArguments();
 void FormatHasAnUnknownConversion();

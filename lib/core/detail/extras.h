@@ -14,7 +14,7 @@ namespace tavo {
 inline constexpr int32_t kNoResult = -1, kNoMemory = -2, kMostFolded = 8;
 inline constexpr size_t kCryptRoom = 32 << 10, kSaltRoom = 192;
 
-// What the small library exports, as kExtrasSymbol. Its functions throw nothing and keep no state.
+// The exports of the small library, as kExtrasSymbol. Its functions throw nothing and keep no state.
 struct Extras {
     uint32_t version;  // kExtrasVersion: both libraries are from one build
     uint32_t size;     // of this table
@@ -34,8 +34,8 @@ struct Extras {
     void (*des)(const uint8_t key[8], const uint8_t block[8], uint8_t out[8]);
     void (*md4)(const uint8_t *data, size_t length, uint8_t digest[16]);
 
-    // The database: dbopen for a btree, whose handle is its own table of functions; the end of it, -1 with errno when not
-    // everything was written; and the function that it calls in place of fsync (nullptr: fsync again).
+    // The database: dbopen for a btree, whose handle is its own table of functions; the end of it, -1 with errno when
+    // not everything was written; and the function that it calls in place of fsync (nullptr: fsync again).
     void *(*open_btree)(const char *path, int flags, int mode, bool parameters);
     int (*close_btree)(void *store);
     void (*sync_by)(int (*sync)(int fd));

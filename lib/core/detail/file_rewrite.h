@@ -34,7 +34,7 @@ class FileRewrite {
     // to `temp`, syncs and closes it. False with errno.
     bool Complete(Fd &temp, std::string_view text, mode_t mode_of_new = 0666) noexcept;
 
-    // Whether the last Replace also made its rename durable. The rename has happened either way.
+    // Returns whether the last Replace also made its rename durable. The rename has happened either way.
     bool IsDirectorySynced() const noexcept { return directory_synced_; }
 
     // The path of the file itself, with links followed.

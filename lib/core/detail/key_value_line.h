@@ -41,8 +41,8 @@ constexpr bool IsAroundKey(char byte)
     return IsWhiteSpace(byte) || byte == '=' || byte == '"';
 }
 
-// Whether a line sets the key. Readers ask this of every line of a file; the first byte that may belong to a key
-// decides most of them.
+// Returns whether a line sets the key. Readers ask this of every line of a file; the first byte that may belong to a
+// key decides most of them.
 inline bool LineSetsKey(std::string_view line, std::string_view key)
 {
     if (key.empty())
@@ -70,7 +70,7 @@ std::optional<KeyValue> SplitLine(std::string_view line, std::string_view separa
 // Splits at the first "="; the value may be empty. Empty for comments and for lines without a key.
 std::optional<KeyValue> SplitAtEqualSign(std::string_view line);
 
-// Whether a key can be found again once written, and neither text adds a line.
+// Returns whether a key can be found again once written, and neither text adds a line.
 bool IsWritableKey(std::string_view key);
 bool IsWritableValue(std::string_view value);
 

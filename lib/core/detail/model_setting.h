@@ -12,7 +12,7 @@ namespace tavo {
 // Returns the value of a key; empty when the file does not set it. Throws bad_alloc.
 std::optional<std::string> ModelSetting(const char *key);
 
-// Whether the key's value is "yes".
+// Returns whether the key's value is "yes".
 bool ModelHas(const char *key);
 
 // Returns a strictly decimal number; UINT64_MAX for a larger one. Empty when the file does not set the key or sets it

@@ -19,7 +19,7 @@ struct Process {
 // Throws bad_alloc.
 std::vector<Process> ListProcesses();
 
-// Whether the process is a zombie. Throws bad_alloc.
+// Returns whether the process is a zombie. Throws bad_alloc.
 bool IsZombie(pid_t pid);
 
 // Returns the line of the process in a process table: "PID ARGUMENTS".

@@ -18,7 +18,7 @@ class PsScratch {
 
     explicit operator bool() const { return static_cast<bool>(fd_); }
 
-    // Whether another user's file has the usual name; the file is then beside it, if it could be created.
+    // Returns whether another user's file has the usual name; the file is then beside it, if it could be created.
     bool IsTaken() const { return is_taken_; }
     const std::string &Path() const { return path_; }
 

@@ -22,7 +22,7 @@ constexpr bool HeadsSection(std::string_view line, std::string_view name)
            line[closing] == ']' && line.find_first_not_of(kWhiteSpace, closing + 1) == line.npos;
 }
 
-// Whether a header with this name can be found again.
+// Returns whether a header with this name can be found again.
 constexpr bool IsWritableSectionName(std::string_view name)
 {
     return name.find_first_of("]\n\r") == name.npos;

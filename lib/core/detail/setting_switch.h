@@ -8,17 +8,17 @@
 
 namespace tavo {
 
-// Whether the key has exactly this value.
+// Returns whether the key has exactly this value.
 bool SettingEquals(const char *path, const char *key, const char *value) noexcept;
 
-// Whether the value is exactly "yes".
+// Returns whether the value is exactly "yes".
 bool SettingIsYes(const char *path, const char *key) noexcept;
 
-// Whether the value is "yes" in any case of letters: services and capabilities of the model.
+// Returns whether the value is "yes" in any case of letters: services and capabilities of the model.
 bool SettingSaysYes(const char *path, const char *key) noexcept;
 
-// Whether the key has exactly that value; nothing when the file is there and cannot be read. Leaves the error state alone.
-// Throws bad_alloc.
+// Returns whether the key has exactly that value; nothing when the file is there and cannot be read. Leaves the error
+// state alone. Throws bad_alloc.
 std::optional<bool> ReadSetting(const char *path, const char *key, const char *value);
 
 }  // namespace tavo

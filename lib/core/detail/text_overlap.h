@@ -1,4 +1,4 @@
-// Whether two stretches of memory share a byte.
+// Checks whether two stretches of memory share a byte.
 #ifndef TAVO_CORE_DETAIL_TEXT_OVERLAP_H
 #define TAVO_CORE_DETAIL_TEXT_OVERLAP_H
 

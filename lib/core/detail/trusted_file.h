@@ -19,8 +19,8 @@ namespace tavo {
 // True when everybody may create names in the directory that holds `path`. False when the directory cannot be examined.
 bool IsInPublicDirectory(const char *path);
 
-// Whether a file with this state is our own: it belongs to root or to the caller and, unless it is a directory, has
-// only one name. `st` comes from fstat or lstat, never from stat, which follows links.
+// Returns whether a file with this state is our own: it belongs to root or to the caller and, unless it is a directory,
+// has only one name. `st` comes from fstat or lstat, never from stat, which follows links.
 bool IsTrusted(const struct stat &st) noexcept;
 
 // OpenFd, except that in a public directory it opens only regular files that are trusted (else EPERM, EISDIR, EINVAL or

@@ -9,7 +9,7 @@
 
 namespace {
 
-// Returns the first byte as it was before encoding, and advances the text.
+// Decodes and returns the first byte, and advances the text.
 char NextDecoded(std::string_view &text)
 {
     const tavo::ColonCode *code = tavo::CodeAt(text);

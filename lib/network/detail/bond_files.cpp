@@ -17,7 +17,7 @@
 namespace tavo {
 namespace {
 
-// What a bond takes over from its first member, so that the appliance keeps its address.
+// The keys that a bond takes over from its first member, so that the appliance keeps its address.
 constexpr const char *kAddressKeys[] = {"BOOTPROTO", "IPADDR",   "NETMASK",  "BROADCAST",
                                         "NETWORK",   "IPV6INIT", "IPV6ADDR", "IPV6PREFIXLENG"};
 
@@ -32,7 +32,7 @@ bool Exists(const std::string &path)
     return ::lstat(path.c_str(), &st) == 0 || errno != ENOENT;
 }
 
-// Reads for one change. What is made of a file that could not be read would lack its lines, so the change is given up.
+// Reads for one change. A new file made from an unreadable one would lack its lines, so the change is cancelled.
 class OldFiles {
   public:
     std::string Setting(const std::string &file, const char *key) { return Note(TryReadSetting(file, key)); }
@@ -175,7 +175,7 @@ int BondChange::Prepare(const std::string &bond, BondMode mode, const std::vecto
     if (mode != BondMode::none)
         members_ = members;
 
-    // What neither gets its copy back nor joins the new bond, and cannot stay as it is.
+    // Members that neither get their saved file back nor join the new bond must change, too.
     std::erase_if(plain, [&](const std::string &interface) {
         return old.HasCopyToRestore(interface) ||
                (HasInterfaceFile(interface) && old.Setting(InterfaceFile(interface), "MASTER").empty()) ||

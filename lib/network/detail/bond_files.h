@@ -24,9 +24,9 @@ bool HasInterfaceFile(const std::string &interface);
 // One change of a bond, from preparation to the last file.
 class BondChange {
   public:
-    // Writes all new files beside the old ones: what can fail for lack of room fails here, while the network still
-    // runs. Mode none dissolves; `members` are then those that become plain interfaces even without a copy to restore.
-    // 0 or ERR_READ_FAILED, ERR_WRITE_FAILED: nothing has changed.
+    // Writes all new files beside the old ones, so that a lack of room is noticed here, while the network still runs.
+    // Mode none dissolves; `members` are then those that become plain interfaces even without a copy to restore. 0 or
+    // ERR_READ_FAILED, ERR_WRITE_FAILED: nothing has changed.
     int Prepare(const std::string &bond, BondMode mode, const std::vector<std::string> &members);
 
     // Puts them in place. When it fails some of them are, and the caller puts the old ones back.

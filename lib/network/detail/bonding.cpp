@@ -1,4 +1,4 @@
-// What the kernel's bonding driver says of a bond, and the options that make one.
+// Reads a bond from the kernel's bonding driver, and the options that make one.
 #include "network/detail/bonding.h"
 
 #include "core/detail/text_fields.h"

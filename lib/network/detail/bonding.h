@@ -1,4 +1,4 @@
-// What the kernel's bonding driver says of a bond, and the options that make one.
+// Reads a bond from the kernel's bonding driver, and the options that make one.
 #ifndef TAVO_NETWORK_DETAIL_BONDING_H
 #define TAVO_NETWORK_DETAIL_BONDING_H
 

@@ -1,4 +1,4 @@
-// The network as it was before a change: its record, and how it is put back.
+// The state of the network before a change: recording and restoring it.
 #include "network/detail/checkpoint.h"
 
 #include "core/detail/log.h"
@@ -22,8 +22,8 @@ constexpr const char *kRecord = "/etc/network.undo";
 
 constinit int noted_in = -1;  // the record of the change that this process makes
 
-// The first line of the record: the command in progress, its process once it has one. It is written over, so its length is
-// fixed.
+// The first line of the record: the command in progress, its process once it has one. It is written over, so its length
+// is fixed.
 constexpr size_t kLongestCommand = 300;
 
 std::string CommandLine(pid_t pid, const std::string &beginning, std::string_view command)
@@ -69,7 +69,7 @@ void Checkpoint::Begin(Where where)
     if (noted_in >= 0 || ::geteuid() != 0)
         return;  // a part of a larger change, or of none that could come to pass
     const std::string text = CommandLine(0, "-", "") + "boot " + BootId() + UndoText(steps_);
-    // Its end says that it is whole: what was cut off before that is not a change yet.
+    // The end mark shows that the record is complete: without it the change has not begun.
     ::unlink(kRecord);
     record_ = OpenFd(kRecord, O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW, 0600);
     if (record_ && WriteAll(record_.Get(), text) && SyncFd(record_.Get())) {

@@ -26,7 +26,7 @@ class Checkpoint {
     Checkpoint(const Checkpoint &) = delete;
     Checkpoint &operator=(const Checkpoint &) = delete;
 
-    // What the change may touch, in the order in which it is put back. False when it cannot be read.
+    // The parts that the change may touch, in the order in which they are restored. False when one cannot be read.
     bool AddFile(const std::string &path);
     bool AddInterfaceFiles();
     void AddSetting(const char *path, const std::string &key);
@@ -73,7 +73,7 @@ class Checkpoint {
     Fd record_;
 };
 
-// What the kernel has for an interface, as one comparable text.
+// The kernel's settings of an interface, as one comparable text.
 std::string LiveCardText(const std::string &interface);
 
 // Finishes what a process that died has left: everything is as before its change. After a restart of the system only

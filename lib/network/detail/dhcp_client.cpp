@@ -16,7 +16,7 @@ namespace tavo {
 
 namespace {
 
-// The file outlives a crash of the client, and its number may be anybody's by then.
+// The file stays after a crash of the client, and another process may have its number by then.
 bool IsDhcpClient(pid_t pid)
 {
     for (const Process &process : pid > 0 ? ListProcesses() : std::vector<Process>()) {

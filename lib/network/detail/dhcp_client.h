@@ -15,14 +15,14 @@ enum class ClientEnd {
     alive,  // it runs and cannot be killed right now
 };
 
-// One attempt. A pid file that names no process, or somebody else's, names no client.
+// One attempt. A pid file without a process, or with the id of another program, names no client.
 ClientEnd KillDhcpClient(const std::string &interface);
 
 // Ends the client that runs, so that two never fight over one interface, and clears the address. False, with nothing
-// cleared, for a client that outlives 30 attempts, one a second: it hangs in the kernel.
+// cleared, for a client that survives 30 attempts, one per second, because it is blocked in the kernel.
 bool EndDhcpClient(const std::string &interface, Where where = Where());
 
-// Whether a client takes care of the interface.
+// Returns whether a client takes care of the interface.
 bool HasDhcpClient(const std::string &interface);
 
 // Starts one without waiting for its lease.

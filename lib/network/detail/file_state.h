@@ -19,7 +19,7 @@ struct FileState {
 // Empty when there is a file that cannot be read.
 std::optional<FileState> ReadFileState(const std::string &path);
 
-// A file that is as it was is not touched. 0 or a code.
+// An unchanged file is not touched. 0 or a code.
 int PutBack(const FileState &file);
 
 // All interface files and their saved copies.

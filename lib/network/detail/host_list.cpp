@@ -24,7 +24,7 @@ long LeadingNumber(std::string_view field) noexcept
 
 using Fields = std::array<std::string_view, kFields>;
 
-// False when there are fewer; what follows the last one is left out.
+// False when there are fewer; text after the last one is left out.
 bool Split(std::string_view line, Fields &field) noexcept
 {
     for (size_t i = 0; i < kFields; ++i) {

@@ -23,7 +23,7 @@ std::optional<std::string> OwnHostName();
 // name or address cannot be read the file stays. The caller holds the network lock.
 int UpdateHosts(std::string_view old_name = {});
 
-// Whether UpdateHosts would leave the file as it is; also where something cannot be read.
+// Returns whether UpdateHosts would leave the file unchanged; also when something cannot be read.
 bool AreHostsTrue();
 
 }  // namespace tavo

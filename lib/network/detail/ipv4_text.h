@@ -21,8 +21,8 @@ struct Ipv4 {
 
 std::optional<Ipv4> ParseIpv4(std::string_view text) noexcept;
 
-// Whether a host can have it: the first number is 1 to 223 but not 127. A last one of 255 is taken for a broadcast
-// whatever the mask says, because the web pages know no mask at this point.
+// Returns whether a host can have it: the first number is 1 to 223 but not 127. A last one of 255 is taken for a
+// broadcast whatever the mask says, because the web pages know no mask at this point.
 bool IsHostAddress(const Ipv4 &address) noexcept;
 
 // The number of leading one bits; empty when ones follow a zero.
@@ -30,7 +30,7 @@ std::optional<int> PrefixLength(const Ipv4 &mask) noexcept;
 
 Ipv4 MaskOf(int prefix_length) noexcept;
 
-// What goes before and after the first slash; empty without one.
+// The texts before and after the first slash; empty without one.
 struct SlashPair {
     std::string_view before;
     std::string_view after;

@@ -14,7 +14,8 @@ constexpr bool IsPrefixLength(int length) noexcept
 
 enum class Ipv6AddressChange { add, remove };
 
-// The body of TAVONetIPv6AddrAdd and TAVONetIPv6AddrDel: what they refuse, the change in the kernel, and the interface file.
+// The body of TAVONetIPv6AddrAdd and TAVONetIPv6AddrDel: the refusals, the change in the kernel, and the interface
+// file.
 int ChangeIpv6Address(Ipv6AddressChange change, const char *interface, const char *text, int length,
                       Where where = Where()) noexcept;
 

@@ -1,4 +1,4 @@
-// What the kernel knows of the network interfaces.
+// The kernel's state of the network interfaces.
 #include "network/detail/kernel_interface.h"
 
 #include "core/detail/open_file.h"

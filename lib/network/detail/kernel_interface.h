@@ -1,4 +1,4 @@
-// What the kernel knows of the network interfaces: /sys/class/net and the interface requests of a socket.
+// The kernel's state of the network interfaces: /sys/class/net and the interface requests of a socket.
 #ifndef TAVO_NETWORK_DETAIL_KERNEL_INTERFACE_H
 #define TAVO_NETWORK_DETAIL_KERNEL_INTERFACE_H
 

@@ -8,7 +8,7 @@
 namespace tavo {
 
 inline constexpr const char *kMtuDefault = "1500";
-inline constexpr int kMtuLeast = 68;  // what IPv4 needs to work at all
+inline constexpr int kMtuLeast = 68;  // the minimum of IPv4
 inline constexpr int kMtuMost = 65535;
 
 constexpr bool IsMtu(int mtu) noexcept

@@ -19,7 +19,7 @@ int RunNetText(const std::string &command, bool quietly)
     Checkpoint::NoteCommand(pid, beginning, command);
     const int status = CollectChild(pid);
     if (status == -1)
-        EndProcess(pid, beginning);  // what could not be waited for must not go on beside what comes next
+        EndProcess(pid, beginning);  // a command that could not be waited for must not run beside the next step
     return status;
 }
 

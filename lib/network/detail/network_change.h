@@ -14,16 +14,16 @@
 
 namespace tavo {
 
-// For somebody who has held the lock: rewrites /etc/hosts where the hook of a DHCP client could not, because the lock was
-// held. That it cannot be written is logged.
+// Called by a function that has held the lock: rewrites /etc/hosts if the hook of a DHCP client could not, because the
+// lock was held. A failure is logged.
 void KeepHostsTrueAfterwards(Where where = Where());
 
-// For somebody who holds the lock and changes nothing himself: finishes what a process that died has left, and rewrites
-// /etc/hosts where it is not true. 0 or the code of the latter.
+// Called under the lock without a change of its own: completes the change of a process that died, and rewrites
+// /etc/hosts if it is out of date. Returns 0 or the code of the latter.
 int FinishAndKeepHostsTrue(Where where = Where());
 
 // Runs the body, which gives the result of the exported function, under the lock: with `more_locks` in one request.
-// -1 with ERR_LOCK_FAILED when the lock cannot be had.
+// -1 with ERR_LOCK_FAILED when the lock is not free in time.
 int ChangeNetwork(FunctionRef<int()> body, unsigned more_locks = 0, Where where = Where());
 
 }  // namespace tavo

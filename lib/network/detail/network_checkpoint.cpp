@@ -27,7 +27,7 @@ namespace tavo {
 namespace {
 
 constexpr const char *kRecordOfAll = "/etc/network.checkpoint";
-// What beside /etc/sysconfig/network, /etc/hosts and /etc/resolv.conf describes the network.
+// Files and keys that describe the network, besides /etc/sysconfig/network, /etc/hosts and /etc/resolv.conf.
 constexpr const char *kFileStems[] = {"ifcfg-", "more-", "search"};
 constexpr const char *kKeyTails[] = {"_mtu", "_wol_options"};
 
@@ -143,7 +143,7 @@ void PutBackFiles(const std::vector<UndoStep> &steps)
     }
 }
 
-// What is as it was is not touched: the other cards of the appliance are in use.
+// Unchanged parts are not touched, because the other cards of the appliance are in use.
 int PutBackAll(const std::vector<UndoStep> &steps)
 {
     const auto interfaces = Interfaces();

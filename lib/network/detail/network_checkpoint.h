@@ -15,7 +15,7 @@ int TakeNetworkCheckpoint(Where where = Where());
 // ERR_FILE_NOT_FOUND: there is none.
 int EndNetworkCheckpoint();
 
-// The same, with the network as it was. ERR_OP_FAILURE: an address could not be set.
+// The same, after restoring the network. ERR_OP_FAILURE: an address could not be set.
 int PutBackNetworkCheckpoint();
 
 // Puts back one whose process is not there any more; after a restart of the system its files only.

@@ -1,4 +1,4 @@
-// What a checkpoint keeps of each part of the network.
+// The parts of the network that a checkpoint records.
 #include "network/detail/checkpoint.h"
 
 #include "core/detail/pid_file.h"
@@ -35,7 +35,7 @@ UndoStep FileStep(const FileState &file)
     return {UndoStep::file, file.path, *file.text, error == std::errc() ? std::string(mode, end) : "644"};
 }
 
-// The value as it is in the file, with any quotation marks.
+// The value exactly as in the file, with any quotation marks.
 std::string RawSetting(const char *path, const std::string &key)
 {
     const std::string text = ReadKernelFile(path).value_or("");

@@ -1,4 +1,4 @@
-// Routes that are added and removed: what is refused, and the tools that change them.
+// Adding and removing routes: the refusals, and the tools that change them.
 #ifndef TAVO_NETWORK_DETAIL_ROUTE_CHANGE_H
 #define TAVO_NETWORK_DETAIL_ROUTE_CHANGE_H
 

@@ -1,4 +1,4 @@
-// What puts a piece of the network back, as data.
+// The steps that restore parts of the network, as data.
 #include "network/detail/undo_step.h"
 
 #include "core/detail/text_fields.h"

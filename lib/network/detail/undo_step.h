@@ -1,4 +1,5 @@
-// What puts a piece of the network back, as data: it goes into a file that a later process may have to work through.
+// The steps that restore parts of the network, as data: they are written to a file that a later process may have to
+// execute.
 #ifndef TAVO_NETWORK_DETAIL_UNDO_STEP_H
 #define TAVO_NETWORK_DETAIL_UNDO_STEP_H
 

@@ -11,13 +11,15 @@ namespace tavo {
 
 bool IsWakeOnLanSupported();
 
-// Whether the controller of the front panel, which has power when the appliance is off, does the waking on this model.
+// Returns whether the controller of the front panel, which has power when the appliance is off, does the waking on this
+// model.
 bool IsWokenByPanel();
 
 // The settings key of an interface: "eth0_wol_options".
 std::string WakeOptionsKey(std::string_view interface);
 
-// The card's bits for letters such as "g" or "ug"; "d" is none. Empty for a text with any other letter in it, or none.
+// The card's bits for letters such as "g" or "ug"; "d" means no bits. Empty for a text without letters or with any
+// other letter.
 std::optional<uint32_t> ParseWakeOptions(std::string_view letters) noexcept;
 
 struct WakeSettings {

@@ -22,7 +22,7 @@ class Hosts {
   public:
     Hosts(TAVOFHOSTCALLBACK callback, void *context) : callback_(callback), context_(context) {}
 
-    // Hands over who is new in the list. The result of the callback, once it is not 0.
+    // Passes new hosts of the list to the callback. Returns its result, once it is not 0.
     int Read(const char *path)
     {
         const tavo::Fd list = tavo::OpenHostList(path);
@@ -73,7 +73,7 @@ extern "C" int TAVOFHOSTEnum(TAVOFHOSTCALLBACK pfnHost, void *pContext, int cSec
             if (hosts.Read(tavo::kHostList) != 0 || hosts.Read(tavo::kHostListTaken) != 0)
                 break;
         }
-        // Where one interface cannot send, the others may well have found somebody.
+        // When one interface cannot send, hosts may have answered on the others.
         return sent || hosts.Count() > 0 ? hosts.Count() : Fail(ERR_OP_FAILURE);
     });
 }

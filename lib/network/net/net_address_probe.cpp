@@ -64,7 +64,7 @@ class ArpSocket {
                         sizeof everybody_) == static_cast<ssize_t>(sizeof packet);
     }
 
-    // Whether somebody else speaks as the address, or wants it too, within that time.
+    // Returns whether another host uses the address, or wants it too, within that time.
     bool Hears(const in_addr &wanted, int milliseconds) const
     {
         const int64_t end = Milliseconds() + milliseconds;

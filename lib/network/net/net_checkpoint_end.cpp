@@ -1,4 +1,4 @@
-// Keeps the network as it is now.
+// Ends a checkpoint and keeps the present network.
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"

@@ -1,4 +1,4 @@
-// Puts the whole network back as it was when its checkpoint was taken.
+// Restores the whole network to the state of its checkpoint.
 #include "tavo_net.h"
 
 #include "core/detail/guard.h"

@@ -11,7 +11,7 @@
 
 namespace {
 
-// What a shell says of a program that is not there, or that it cannot execute.
+// The exit statuses of a shell for a program that does not exist or cannot be executed.
 constexpr int kNotExecutable = 126;
 constexpr int kNotFound = 127;
 

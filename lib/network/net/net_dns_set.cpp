@@ -18,7 +18,7 @@ namespace {
 
 constexpr const char *kResolver = "/etc/resolv.conf";
 
-// The address as the resolver reads it, to whom "010" is 8; empty for what is none.
+// The address as the resolver reads it ("010" is 8); empty for other text.
 std::string ServerText(const char *text)
 {
     if (const auto address = tavo::ParseIpv4(text))

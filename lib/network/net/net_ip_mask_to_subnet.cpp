@@ -9,7 +9,7 @@
 
 namespace {
 
-constexpr size_t kBuffer = 64;  // what every caller of the two conversions brings
+constexpr size_t kBuffer = 64;  // buffer size that every caller passes
 
 }  // namespace
 

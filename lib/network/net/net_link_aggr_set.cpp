@@ -73,7 +73,7 @@ void AddPhysicalMembers(TAVONETLINKAGGR &aggr)
 constexpr const char *kStop = "/etc/rc.network stop > /dev/null 2>&1";
 constexpr const char *kStart = "/etc/rc.network start > /dev/null 2>&1";
 
-// What there is before the change, and the files that it makes. False when it cannot be read.
+// Records the state before the change, and the files that it creates. False when it cannot be read.
 bool Snapshot(tavo::Checkpoint &before, const TAVONETLINKAGGR &aggr)
 {
     before.AddCommand(kStop);

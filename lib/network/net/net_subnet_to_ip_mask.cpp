@@ -9,7 +9,7 @@
 
 namespace {
 
-constexpr size_t kBuffer = 64;  // what every caller of the two conversions brings
+constexpr size_t kBuffer = 64;  // buffer size that every caller passes
 
 // Reads any base of C ("010" is 8, "0x18" is 24), because existing pages and scripts use them. 0 when it is not a
 // length.

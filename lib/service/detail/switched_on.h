@@ -1,4 +1,4 @@
-// Whether a service is switched on.
+// Checks whether a service is switched on.
 #ifndef TAVO_SERVICE_DETAIL_SWITCHED_ON_H
 #define TAVO_SERVICE_DETAIL_SWITCHED_ON_H
 
@@ -8,7 +8,7 @@
 
 namespace tavo {
 
-// Whether the service's key switches it on. A service without a key is driven by others.
+// Returns whether the service's key switches it on. A service without a key is driven by others.
 inline bool IsSwitchedOn(const TAVOSERVICE &service) noexcept
 {
     return service.szKey && SettingSaysYes(kSettings, service.szKey);

@@ -43,7 +43,7 @@ constexpr std::optional<int> KernelOfLevel(int bit)
     return std::nullopt;
 }
 
-// RAID 5 for a name that is none: most arrays of the appliance are.
+// RAID 5 for an unknown name, because most arrays of the appliance have that level.
 constexpr int LevelOfName(std::string_view name)
 {
     for (const ArrayLevel &level : kArrayLevels) {
@@ -53,7 +53,7 @@ constexpr int LevelOfName(std::string_view name)
     return RAID_LEVEL_5;
 }
 
-// Whether no member can fail without the array.
+// Returns whether no member can fail without the array.
 constexpr bool HasNoRedundancy(int bit)
 {
     return bit == RAID_LEVEL_0 || bit == RAID_LEVEL_LINEAR;

@@ -1,4 +1,4 @@
-// What the md driver says about an open array and its members.
+// The md driver's description of an open array and its members.
 #include "storage/detail/array_members.h"
 
 #include "core/detail/owner.h"
@@ -43,8 +43,8 @@ bool HasPath(const RAIDMEMBER *members, std::string_view path)
     return members != nullptr;
 }
 
-// The name that md keeps for a member whose device is gone. It follows from the number; where it does not, the only name
-// that no other member has is it.
+// The name that md keeps for a member whose device is gone. It follows from the number; where it does not, the only
+// name that no other member has is it.
 std::string PulledPath(int array, DeviceNumber device, const RAIDMEMBER *members)
 {
     const std::string name = ScsiName(device.major_number, device.minor_number);

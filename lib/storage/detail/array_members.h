@@ -1,4 +1,4 @@
-// What the md driver says about an open array and its members.
+// The md driver's description of an open array and its members.
 #ifndef TAVO_STORAGE_DETAIL_ARRAY_MEMBERS_H
 #define TAVO_STORAGE_DETAIL_ARRAY_MEMBERS_H
 
@@ -22,11 +22,12 @@ void FreeMembers(RAIDMEMBER *members) noexcept;
 // RAID_MEMBER_ of the kernel's state bits.
 int MemberState(int kernel_state, bool has_no_redundancy);
 
-// The members as heap nodes, in the order of the kernel's numbers; one whose disk was pulled by the name that md keeps. False
-// when memory ran out.
+// The members as heap nodes, in the order of the kernel's numbers; one whose disk was pulled by the name that md keeps.
+// False when memory ran out.
 bool ReadMembers(int fd, int array_number, const mdu_array_info_t &array, RAIDMEMBER **members);
 
-// Whether a word of sync_action means that the array's members are not all up to date; a scrub ("check") does not.
+// Returns whether a word of sync_action means that the array's members are not all up to date; a scrub ("check") does
+// not.
 bool IsRebuildAction(const char *action);
 
 }  // namespace tavo

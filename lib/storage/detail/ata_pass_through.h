@@ -20,7 +20,7 @@ struct AtaCommand {
     uint8_t lba_high = 0;
 };
 
-// What the drive's registers hold afterwards.
+// The drive's registers after the command.
 struct AtaResult {
     uint8_t error;
     uint8_t count;

@@ -19,7 +19,8 @@ bool HasTableSignature(const BootSector &sector);
 // PARTITION_TABLE_ of tavo_partition.h.
 int TableKind(const BootSector &sector);
 
-// Whether the sector is the boot sector of a FAT16, FAT32 or NTFS file system and its first table entry is none.
+// Returns whether the sector is the boot sector of a FAT16, FAT32 or NTFS file system and its first table entry is not
+// a partition.
 bool IsWindowsVolume(const BootSector &sector);
 
 }  // namespace tavo

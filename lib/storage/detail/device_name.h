@@ -8,8 +8,8 @@ namespace tavo {
 
 inline constexpr std::string_view kDev = "/dev/";
 
-// A name in /dev, /sys/block or /proc/partitions: "sda3", "md2", "mmcblk0p1". Never a way out of the directory and never
-// an option.
+// A name in /dev, /sys/block or /proc/partitions: "sda3", "md2", "mmcblk0p1". Never a way out of the directory and
+// never an option.
 constexpr bool IsDeviceName(std::string_view name)
 {
     constexpr std::string_view plain = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789_.:+-";
@@ -28,7 +28,7 @@ constexpr std::string_view WithoutDev(std::string_view path)
     return path.starts_with(kDev) ? path.substr(kDev.size()) : path;
 }
 
-// What follows the last slash; all of it when there is none.
+// The text after the last slash; all of it when there is none.
 constexpr std::string_view LastPart(std::string_view path)
 {
     return path.substr(path.rfind('/') + 1);

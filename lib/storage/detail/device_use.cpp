@@ -1,4 +1,4 @@
-// What the kernel has on top of a disk or partition.
+// The kernel's uses of a disk or partition.
 #include "storage/detail/device_use.h"
 
 #include "core/detail/open_file.h"

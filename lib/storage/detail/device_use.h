@@ -1,4 +1,4 @@
-// What the kernel has on top of a disk or partition: asked before the first change, so that nothing is left half done.
+// The kernel's uses of a disk or partition: checked before the first change, so that no change stays incomplete.
 #ifndef TAVO_STORAGE_DETAIL_DEVICE_USE_H
 #define TAVO_STORAGE_DETAIL_DEVICE_USE_H
 

@@ -61,7 +61,7 @@ std::optional<int> SmartTemperature(const DrivePage &page)
 
 bool HasNoRotatingMedium(const DrivePage &identity)
 {
-    constexpr unsigned ata_7_and_later = 0x7F80;  // a bit a version; bit 0 and bit 15 are none
+    constexpr unsigned ata_7_and_later = 0x7F80;  // one bit per version; bits 0 and 15 are not versions
     const unsigned versions = Word(identity, 80);
     if (versions != 0xFFFF && (versions & ata_7_and_later) != 0 && Word(identity, 217) == 1)
         return true;

@@ -13,7 +13,7 @@ namespace tavo {
 inline constexpr size_t kPageBytes = 512;
 using DrivePage = std::array<unsigned char, kPageBytes>;
 
-// What every SMART page with a checksum fulfils.
+// The bytes of every SMART page with a checksum sum to 0.
 bool SumIsZero(const unsigned char *page);
 
 // The six raw bytes of the first attribute with that id; empty without one.

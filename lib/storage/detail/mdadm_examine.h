@@ -11,7 +11,7 @@ namespace tavo {
 
 enum class ExamineOutcome { good, bad_version, bad_role, bad_row };
 
-// Takes a line, without its newline, into the record. What is wrong goes to `wrong`; the reading ends there.
+// Adds a line, without its newline, to the record. An invalid text is stored in `wrong`; the reading ends there.
 ExamineOutcome ReadExamineLine(std::string_view line, RAIDSUPERBLOCK &superblock, std::string &wrong);
 
 // "99a1cb1e:1aaa3c52:49268cdc:b4e6580a", and nothing but.

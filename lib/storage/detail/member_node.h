@@ -15,7 +15,7 @@ std::string ScsiName(unsigned major_number, unsigned minor_number);
 // The names by which md holds the members of an array, from /sys/block/mdN/md/dev-*, sorted.
 std::vector<std::string> MemberNames(int array);
 
-// Whether md holds a member by that name, and whether it counts it as failed.
+// Returns whether md holds a member by that name, and whether it counts it as failed.
 bool IsMemberName(int array, std::string_view name);
 bool IsFaulty(int array, std::string_view name);
 

@@ -1,4 +1,4 @@
-// Whether a disk or partition is large enough for an array.
+// Checks whether a disk or partition is large enough for an array.
 #ifndef TAVO_STORAGE_DETAIL_MEMBER_SIZE_H
 #define TAVO_STORAGE_DETAIL_MEMBER_SIZE_H
 

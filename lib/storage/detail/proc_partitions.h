@@ -23,7 +23,7 @@ struct PartitionsRow {
     int32_t DeviceNumber() const { return static_cast<int32_t>(major * 256 + minor); }
 };
 
-// A row has exactly four fields, the first three of them numbers; the heading and the empty line below it are none.
+// A row has exactly four fields, the first three of them numbers; the heading and the empty line below it are not rows.
 std::optional<PartitionsRow> ParsePartitionsRow(std::string_view line);
 
 // The open file, line by line.

@@ -14,7 +14,7 @@ namespace tavo {
 // 0, ERR_OPEN_RAWDEVICE, ERR_STAT_FAILED or ERR_NOT_A_DISK.
 int OpenRawDisk(const char *path, Fd &fd);
 
-// Whether the disk hangs on a controller of the system-on-chip: 1 or 0; -1 with the path that cannot be read.
+// Returns whether the disk's controller is that of the system-on-chip: 1 or 0; -1 with the path that cannot be read.
 int HangsOnMarvell(const char *path, std::string &unreadable);
 
 class RawDisk {

@@ -7,7 +7,7 @@
 
 namespace tavo {
 
-// What the body gives for the open disk; -1 with a code of OpenRawDisk.
+// Returns the result of the body for the open disk; -1 with a code of OpenRawDisk.
 template <class Body>
 int WithRawDisk(const char *path, Body &&body, Where where = Where())
 {

@@ -8,7 +8,7 @@
 namespace tavo {
 namespace {
 
-constexpr size_t kReadable = 63;  // what has ever been read of a line; the name at its end is not needed
+constexpr size_t kReadable = 63;  // only so much of a line has ever been read; the name at its end is not needed
 
 template <class Number>
 bool ParseField(std::string_view field, Number &number, int base)

@@ -1,4 +1,4 @@
-// The USB device that a disk hangs on.
+// The USB device of a disk.
 #include "storage/detail/usb_id.h"
 
 #include "core/detail/line_reader.h"

@@ -1,4 +1,4 @@
-// The USB device that a disk hangs on.
+// The USB device of a disk.
 #ifndef TAVO_STORAGE_DETAIL_USB_ID_H
 #define TAVO_STORAGE_DETAIL_USB_ID_H
 
@@ -12,7 +12,7 @@ struct UsbId {
     unsigned product;
 };
 
-// From /sys, for the disk of kernel name `name`; empty when it hangs on no USB device.
+// From /sys, for the disk of kernel name `name`; empty when it is not on USB.
 std::optional<UsbId> UsbIdOfDisk(std::string_view name);
 
 // Four hexadecimal digits and a newline, as the kernel gives an id.

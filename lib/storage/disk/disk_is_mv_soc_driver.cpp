@@ -1,4 +1,4 @@
-// Checks whether a disk hangs on a controller that takes no raw ATA commands.
+// Checks whether a disk's controller takes no raw ATA commands.
 #include "tavo_disk.h"
 
 #include "core/detail/guard.h"

@@ -35,7 +35,7 @@ bool IsOnDisk(const LVMPV &pv)
     return std::string_view(pv.szPv).starts_with("/dev/sd");
 }
 
-// A stick or a disk that somebody plugged in and wants back. Whatever sysfs does not know is taken for a bay's.
+// A USB stick or disk, which its owner wants back. A disk that sysfs does not describe counts as one in a bay.
 bool IsOnUsb(const LVMPV &pv)
 {
     return IsOnDisk(pv) && tavo::UsbIdOfDisk(tavo::WithoutNumber(tavo::WithoutDev(pv.szPv))).has_value();
@@ -53,7 +53,7 @@ bool IsForeign(const LVMPVLIST *all, const LVMPV &pv)
     return false;
 }
 
-// Whether the kernel has a device on top of it that is not a volume of its own group.
+// Returns whether the kernel has a device on top of it that is not a volume of its own group.
 bool IsHeldByOthers(const LVMPV &pv)
 {
     const std::string text = tavo::HoldersOf(tavo::LastPart(pv.szPv));

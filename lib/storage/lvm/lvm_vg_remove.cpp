@@ -8,7 +8,7 @@
 
 extern "C" int LVMVgRemove(const char *szVg)
 {
-    // What passes is removed with all that is below it.
+    // A path that passes this check is removed with everything below it.
     if (!szVg || !tavo::IsGroupPath(szVg)) {
         LogError("%s:%d Bad parameters");
         return -1;

@@ -56,7 +56,7 @@ Remaining Look(const RAIDINFO &info)
     return remaining;
 }
 
-// What mdadm has gathered and not started holds its members.
+// An array that mdadm has assembled but not started holds its members.
 void LetGo(const RAIDINFO &info, int number)
 {
     if (tavo::KernelText(tavo::ArrayFile(number, "md/array_state")) == "inactive")

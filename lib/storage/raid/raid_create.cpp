@@ -13,7 +13,7 @@
 
 namespace {
 
-constexpr size_t kMostCommand = 511;  // what the appliance's tools take: 512 bytes with the final NUL
+constexpr size_t kMostCommand = 511;  // limit of the appliance's tools: 512 bytes with the final NUL
 
 struct LevelOption {
     const char *level;

@@ -19,7 +19,7 @@ bool IsGone(int code)
     return code == ERR_SIZE_UNKNOWN || code == ERR_OPEN_FAILED || code == ERR_PATH_NOT_FOUND;
 }
 
-// 1 added, 0 passed over, -1.
+// Returns 1 when added, 0 when skipped, or -1.
 int Add(const char *path, std::unique_ptr<RAIDLIST, FreeList> &owner)
 {
     RAIDINFO *info = nullptr;

@@ -21,7 +21,7 @@ bool AddMembers(const RAIDINFO &info, const TLIBSZLIST &members, int first, int 
     return true;
 }
 
-// Whether one of them is in use, or is known to be too small: the level cannot be changed back.
+// Returns whether one of them is in use, or is known to be too small: the level cannot be changed back.
 bool IsUnfit(const RAIDINFO &info, const TLIBSZLIST &members)
 {
     for (int i = 0; i < members.nItem; ++i) {

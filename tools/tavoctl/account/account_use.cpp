@@ -39,7 +39,7 @@ std::string SessionOf(const std::string &name)
     return terminal;
 }
 
-// Whether one of the process's user ids is this one: real, effective, saved, or of its file accesses.
+// Returns whether one of the process's user ids is this one: real, effective, saved, or of its file accesses.
 bool RunsAs(pid_t pid, uid_t uid)
 {
     std::ifstream in("/proc/" + std::to_string(pid) + "/status");

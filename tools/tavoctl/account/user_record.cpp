@@ -63,7 +63,7 @@ bool SameTexts(const User &a, const User &b)
     return a.name == b.name && a.description == b.description && a.shell == b.shell && a.mail == b.mail;
 }
 
-// Whether the account is what the change made of it. Where the library chooses, whatever it chose is right.
+// Returns whether the account is what the change made of it. Where the library chooses, whatever it chose is right.
 bool IsDone(const UserChange &change)
 {
     const std::optional<User> now = FindUser(change.user.name);

@@ -82,8 +82,8 @@ class ServiceSource : public EventSource {
     }
 
   private:
-    // Whether a pid file has changed or a process ended. Looking at services makes files in the same folders: by those
-    // alone they would be looked at again and again.
+    // Returns whether a pid file has changed or a process ended. Looking at services makes files in the same folders:
+    // by those alone they would be looked at again and again.
     bool SomeChanged()
     {
         bool changed = false;

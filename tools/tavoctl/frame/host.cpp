@@ -1,4 +1,4 @@
-// Whether this machine is an appliance.
+// Returns whether this machine is an appliance.
 #include "frame/host.h"
 
 #include "frame/failure.h"

@@ -1,4 +1,4 @@
-// Whether this machine is an appliance.
+// Returns whether this machine is an appliance.
 #ifndef TAVOCTL_HOST_H
 #define TAVOCTL_HOST_H
 

@@ -132,8 +132,8 @@ struct Call {
     // Records a chosen value, such as an id; a field of the JSON beside "changed".
     void Tell(const std::string &name, const Cell &value) { report.chosen.emplace_back(name, value); }
 
-    // Whether there is something to do: not with --dry-run, and not when nothing was going to change. Asks the question
-    // as Confirm does.
+    // Returns whether there is something to do: not with --dry-run, and not when nothing was going to change. Asks the
+    // question as Confirm does.
     bool Proceed(const std::string &question = {}) const;
 
     // Asks "QUESTION [y/N]" unless --yes was given; throws a Failure unless the answer is yes, or when there is no

@@ -41,7 +41,7 @@ extern const std::vector<NetItem> card_items;
 
 std::string TextOf(const NetFactsMap &facts, const char *name);
 std::vector<std::string> TextsOf(const NetFactsMap &facts, const char *name);
-// Whether the fact is stated and is not null, false or an empty list.
+// Returns whether the fact is stated and is not null, false or an empty list.
 bool IsGiven(const NetFactsMap &facts, const char *name);
 
 // Throws a Failure that names the place.

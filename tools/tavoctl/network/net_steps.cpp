@@ -159,7 +159,7 @@ class CardSteps {
     }
     NetFactsMap Live() const { return LiveCard(name_, Mode()); }
 
-    // Whether the fact is in the document and the network does not have it.
+    // Returns whether the fact is in the document and the network does not have it.
     bool Wants(const char *fact) const
     {
         const auto want = wanted_.find(fact);

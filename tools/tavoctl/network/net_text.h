@@ -24,7 +24,7 @@ NormalText NormalCardMode(const std::string &text);
 // The length of a mask such as 255.255.255.0.
 int LengthOfMask(const std::string &mask);
 
-// Whether the IPv4 address belongs to the network of "192.0.2.10/24".
+// Returns whether the IPv4 address belongs to the network of "192.0.2.10/24".
 bool IsInNetwork(const std::string &address, const std::string &card_address);
 
 }  // namespace tavoctl

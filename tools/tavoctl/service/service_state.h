@@ -63,7 +63,7 @@ ServiceState StateOf(int id, bool may_wait = true);
 // The numbers of its data folders.
 std::vector<int32_t> FoldersOf(int id);
 
-// Whether a file system is mounted at `volume`, "/volume2".
+// Returns whether a file system is mounted at `volume`, "/volume2".
 bool IsMounted(const std::string &volume);
 
 // For completion.

@@ -38,7 +38,7 @@ enum class Power { spinning, standby, unknown };
 // Asking wakes no disk.
 Power PowerOf(const std::string &disk);
 
-// Whether a device is a disk, or a partition of one, that is in standby.
+// Returns whether a device is a disk, or a partition of one, that is in standby.
 bool Sleeps(const std::string &device);
 
 // A disk that does not tell may sleep.

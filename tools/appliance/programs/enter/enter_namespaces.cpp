@@ -183,7 +183,7 @@ void BuildPlace(const Request &request, const std::string &kept, const std::stri
     }
 }
 
-// Whether the command must be started through the emulator, because the kernel does not do so by itself.
+// Returns whether the command must be started through the emulator, because the kernel does not do so by itself.
 bool BringEmulator(const Request &request, bool own_users, const std::string &place, std::string *lacks)
 {
     if (request.emulator.empty())
