@@ -31,6 +31,7 @@ class Reading(unittest.TestCase):
         self.assertEqual(names["TLIBFileGetKeyValue"].parameters, ["szPath", "szKey", "szBuf", "cbBuf", "flags"])
         self.assertEqual(names["TLIBExec"].parameters, ["szProgram", "..."])
         self.assertEqual((names["rgslckList"].kind, names["rgslckList"].returns), ("datum", "TLIBLOCKFILE"))
+        self.assertEqual(names["rgslckList"].section.text, "")
         self.assertIn("Each returns 1 when the text is valid", names["BlTLIBIsMailbox"].section.text)
 
     def test_records_come_with_the_remarks_on_their_fields(self):

@@ -279,7 +279,7 @@ def _sections(source_lines, comments):
     headings = {}
     for end in sorted(comments)[1:]:
         begin, raw = comments[end]
-        if source_lines[begin - 1].startswith("/*") and not source_lines[end].strip():
+        if source_lines[begin - 1].startswith("/*") and not source_lines[end].strip() and "clang-format" not in raw:
             comment = read_comment(raw)
             comment.text = re.sub(r"^--- *| *---$", "", comment.text)
             headings[end] = comment

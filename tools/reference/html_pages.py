@@ -93,18 +93,20 @@ def _runs_of(lines):
         yield kind, run
 
 
-def _entry(group, page, link):
+def _entry(group, link):
     first = group[0]
     page_name = first.family.name
     heading = ", ".join(f'<a id="{entry.name}" href="{page_name}.html#{entry.name}">{entry.name}</a>' for entry in group)
     synopsis = "\n".join(link(line, entry.name) for entry in group for line in entry.declaration(width=110))
     out = [f"<h2>{heading}</h2><pre class=synopsis>{synopsis}</pre>"]
     out += [_prose(text, link, first.name) for text in pages.split(first) if text]
-    for label, items in (("Files", page.files if first.comment.fixed.get("Files") else []),
-                         ("Programs", page.runs), ("Locks", page.locks)):
-        if items:
-            out.append(f"<h3>{label}</h3><p>{', '.join(link(item) for item in items)}</p>")
-    return "".join(out)
+    return "".join(out) + _fixed(first.comment, link)
+
+
+def _fixed(comment, link):
+    return "".join(f"<h3>{label}</h3><p>{', '.join(link(item) for item in comment.fixed[kind])}</p>"
+                   for kind, label in (("Files", "Files"), ("Runs", "Programs"), ("Errors", "Errors"), ("Locks", "Locks"))
+                   if kind in comment.fixed)
 
 
 def _section(text, link):
@@ -151,7 +153,6 @@ def write(folder, version):
     folder.mkdir(parents=True, exist_ok=True)
     families, names = headers.families(), headers.names()
     everything = pages.pages()
-    page_of = {entry.name: page for entry, page in everything}
     link = _Linker(families)
     (folder / "style.css").write_text(_STYLE)
 
@@ -165,7 +166,7 @@ def write(folder, version):
 
     for family in families:
         body = [f"<h1>{link(family.title.rstrip('.'))}</h1><pre class=synopsis>#include &lt;{family.header}&gt;</pre>",
-                _prose(family.intro.text, link), _names(family.names)]
+                _prose(family.intro.text, link), _fixed(family.intro, link), _names(family.names)]
         done, section = set(), None
         for entry in family.names:
             if entry.section.text != section:
@@ -174,7 +175,7 @@ def write(folder, version):
             if entry.name not in done:
                 group = [other for other in family.names if other.name in entry.group] or [entry]
                 done |= {other.name for other in group}
-                body.append(_entry(group, page_of[entry.name], link))
+                body.append(_entry(group, link))
         body += [_records(family, link), _constants(family)]
         (folder / f"{family.name}.html").write_text(_frame(family.name, f"tavosdk: {family.name}", "".join(body), families))
 
