@@ -3,6 +3,7 @@
 
 #include "network/detail/hosts_file.h"
 #include "network/detail/interface_name.h"
+#include "network/detail/ipv6_route_table.h"
 #include "network/detail/ipv6_text.h"
 #include "network/detail/route_table.h"
 #include "network/detail/socket_table.h"
@@ -126,6 +127,10 @@ void CheckTables(const std::string &text, const std::string &word)
         Check(*port >= 0 && *port <= 0xFFFF, "a port");
     for (const std::string &address : tavo::ParseIpv6Table(text, word))
         Check(BlTLIBIsv6IpAddrValid(address.substr(0, address.find('/')).c_str()), "an address of the table");
+    for (const tavo::LiveIpv6Route &route : tavo::ParseIpv6RouteTable(text, word))
+        Check(BlTLIBIsv6IpAddrValid(route.destination.substr(0, route.destination.find('/')).c_str()) &&
+                  (route.gateway.empty() || BlTLIBIsv6IpAddrValid(route.gateway.c_str())),
+              "a route of the table");
     const std::string hosts = tavo::HostsWithName(text, "", "nas", "192.0.2.1");
     Check(tavo::HostsWithName(hosts, "", "nas", "192.0.2.1") == hosts, "a second time nothing changes");
 }

@@ -176,31 +176,34 @@ TAVO_API int TAVOLnxSetHostname(const char *szName);
 TAVO_API int TAVONetHostsRefresh(void);
 
 /*
- * A checkpoint of the whole network: addresses, routes of both families, MTU, link state, DHCP clients, host name,
- * bonds and the files under /etc. A program takes one, changes the network by any number of calls or commands, and then
- * keeps the result or restores everything. The checkpoint is in /etc/network.checkpoint and belongs to the process that
+ * A checkpoint of the whole network: addresses, routes of both families, MTU, link state, wake-on-LAN, DHCP clients, host
+ * name, bonds and the files under /etc. A program takes one, changes the network by any number of calls or commands, and
+ * then keeps the result or restores everything. The checkpoint is in /etc/network.checkpoint and belongs to the process that
  * took it: when that process has died, the next function that changes the network, or TAVONetHostsRefresh, restores the
  * network (after a restart of the system, the files). All three functions hold the network lock while they work. They
- * return 0, or -1 with
- * ERR_LOCK_FAILED or the codes named here.
+ * return 0, or -1 with ERR_LOCK_FAILED or the codes named here.
  */
 
 /* Takes a checkpoint for the calling process. ERR_FILE_EXISTS: another running process has one. ERR_READ_FAILED (one of
  * the files cannot be read), or a code of the settings files: no checkpoint was taken.
- * Files: /etc/network.undo */
+ * Files: /etc/network.checkpoint, /etc/network.undo
+ * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetCheckpointTake(void);
 
 /* Ends the checkpoint and keeps the present network. Any process may do that. ERR_FILE_NOT_FOUND: there is
  * none, or its process has died and the network has just been restored. ERR_REMOVE_FAILED: it could not be removed.
- * Files: /etc/network.undo */
+ * Files: /etc/network.checkpoint, /etc/network.undo
+ * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetCheckpointEnd(void);
 
 /* Restores the network of the time when the checkpoint was taken, and ends the checkpoint. Unchanged interfaces are
  * left alone. When interfaces were added or removed (bonds, VLANs), /etc/rc.network stops the network and starts it
  * with the old files. A DHCP client that ran is started again without waiting for it. ERR_FILE_NOT_FOUND: there is
- * none.
- * ERR_OP_FAILURE: an address could not be set; everything else has been restored.
- * Files: /etc/network.undo */
+ * none. ERR_OP_FAILURE: an address could not be set; everything else has been restored.
+ * Files: /etc/network.checkpoint, /etc/network.undo, /etc/sysconfig/network-scripts, /etc/sysconfig/network, /etc/hosts,
+ *   /etc/resolv.conf, /etc/tavoinfo.conf
+ * Runs: /sbin/ifconfig, /sbin/route, /sbin/ip, /sbin/dhcpcd, /etc/rc.network
+ * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetCheckpointPutBack(void);
 
 /* Pushes the name servers of /etc/resolv.conf onto *ppServers, which may move. Returns their number, or -1 with
@@ -211,7 +214,7 @@ TAVO_API int TAVONetDNSGet(TLIBSZLIST **ppServers);
 /* Replaces /etc/resolv.conf (if it is a link, the file that it leads to) by one "nameserver" line for each address,
  * IPv4 or IPv6. Returns 0, or -1 with the old file in place and ERR_BAD_PARAMETERS (NULL), ERR_INVALID_NETNAME (not an
  * address), ERR_LOCK_FAILED or a code of the settings files.
- * Files: /etc/resolv.conf
+ * Files: /etc/resolv.conf, /etc/network.undo
  * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetDNSSet(const TLIBSZLIST *pServers);
 
@@ -329,11 +332,12 @@ TAVO_API int TAVONetWolGet(const char *szInterface);
 
 /* Enables (fEnable not 0) or disables waking by the interface, and stores that as "NAME_wol_options". The packets that
  * wake the appliance are the letters of ethtool, such as "g", in "wol_enabled_options" of /etc/tavoinfo.conf. The
- * controller of a front panel can only be switched on; that happens under TAVO_LOCK_TTYS1. Returns 0, or -1 with
- * ERR_KEY_NOT_FOUND (no options to enable), ERR_FORMAT_ERROR (unknown letters), ERR_LOCK_FAILED or a code of the
- * settings files.
- * Files: /etc/tavoinfo.conf, /etc.defaults/tavoinfo.conf, /dev/ttyS1
- * Locks: TAVO_LOCK_TTYS1 (exclusive, at most 5 s), TAVO_LOCK_TAVOINFO (exclusive, at most 5 s) */
+ * controller of a front panel can only be switched on (else ERR_OP_UNREGISTERED); that happens under TAVO_LOCK_TTYS1.
+ * Returns 0, or -1 with nothing changed and ERR_KEY_NOT_FOUND (no options to enable), ERR_FORMAT_ERROR (unknown letters),
+ * ERR_LOCK_FAILED or a code of the settings files.
+ * Files: /etc/tavoinfo.conf, /etc.defaults/tavoinfo.conf, /etc/network.undo, /dev/ttyS1
+ * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s), TAVO_LOCK_TAVOINFO (exclusive, at most 5 s), TAVO_LOCK_TTYS1
+ *   (exclusive, at most 5 s) */
 TAVO_API int TAVONetWolSet(const char *szInterface, int fEnable);
 
 /*

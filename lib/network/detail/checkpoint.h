@@ -73,9 +73,6 @@ class Checkpoint {
     Fd record_;
 };
 
-// The kernel's settings of an interface, as one comparable text.
-std::string LiveCardText(const std::string &interface);
-
 // Finishes what a process that died has left: everything is as before its change. After a restart of the system only
 // files are put back. The caller holds the network lock.
 void FinishCutOffChange(Where where = Where());

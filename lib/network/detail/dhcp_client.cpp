@@ -39,9 +39,10 @@ std::string DhcpLeaseFile(const std::string &interface)
     return "/etc/dhcpc/dhcpcd-" + interface + ".info";
 }
 
-bool HasDhcpClient(const std::string &interface)
+pid_t DhcpClientOf(const std::string &interface)
 {
-    return IsDhcpClient(ReadPidFile(DhcpPidFile(interface).c_str()).value_or(0));
+    const pid_t pid = ReadPidFile(DhcpPidFile(interface).c_str()).value_or(0);
+    return IsDhcpClient(pid) ? pid : 0;
 }
 
 void StartDhcpClient(const std::string &interface)
@@ -68,7 +69,7 @@ bool EndDhcpClient(const std::string &interface, Where where)
 
 ClientEnd KillDhcpClient(const std::string &interface)
 {
-    if (!HasDhcpClient(interface))
+    if (DhcpClientOf(interface) == 0)
         return ClientEnd::gone;
     if (SignalByPidFile(DhcpPidFile(interface).c_str(), SIGKILL) == PidSignal::failed && errno != ESRCH)
         return ClientEnd::alive;

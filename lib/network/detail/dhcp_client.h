@@ -6,6 +6,8 @@
 
 #include <string>
 
+#include <sys/types.h>
+
 namespace tavo {
 
 std::string DhcpPidFile(const std::string &interface);
@@ -22,8 +24,8 @@ ClientEnd KillDhcpClient(const std::string &interface);
 // cleared, for a client that survives 30 attempts, one per second, because it is blocked in the kernel.
 bool EndDhcpClient(const std::string &interface, Where where = Where());
 
-// Returns whether a client takes care of the interface.
-bool HasDhcpClient(const std::string &interface);
+// The client that takes care of the interface; 0 for none.
+pid_t DhcpClientOf(const std::string &interface);
 
 // Starts one without waiting for its lease.
 void StartDhcpClient(const std::string &interface);

@@ -18,19 +18,6 @@ bool ReadHex(std::string_view text, Number &value) noexcept
     return error == std::errc() && next == end;
 }
 
-// 32 hexadecimal digits without colons.
-std::optional<in6_addr> ParseDigits(std::string_view digits) noexcept
-{
-    in6_addr address;
-    if (digits.size() != 2 * sizeof address.s6_addr)
-        return std::nullopt;
-    for (size_t i = 0; i < sizeof address.s6_addr; ++i) {
-        if (!ReadHex(digits.substr(2 * i, 2), address.s6_addr[i]))
-            return std::nullopt;
-    }
-    return address;
-}
-
 }  // namespace
 
 std::optional<in6_addr> ParseIpv6(const char *text) noexcept
@@ -62,6 +49,24 @@ bool IsNetwork(const in6_addr &address, int length) noexcept
     return true;
 }
 
+std::optional<in6_addr> ParseIpv6Digits(std::string_view digits) noexcept
+{
+    in6_addr address;
+    if (digits.size() != 2 * sizeof address.s6_addr)
+        return std::nullopt;
+    for (size_t i = 0; i < sizeof address.s6_addr; ++i) {
+        if (!ReadHex(digits.substr(2 * i, 2), address.s6_addr[i]))
+            return std::nullopt;
+    }
+    return address;
+}
+
+std::optional<uint32_t> ReadHexNumber(std::string_view text) noexcept
+{
+    uint32_t value = 0;
+    return ReadHex(text, value) ? std::optional(value) : std::nullopt;
+}
+
 std::vector<std::string> ParseIpv6Table(std::string_view text, std::string_view interface)
 {
     std::vector<std::string> addresses;
@@ -69,10 +74,10 @@ std::vector<std::string> ParseIpv6Table(std::string_view text, std::string_view 
         const auto field = SplitFields(TakeLine(text));  // address, index, length, scope, flags, name
         if (field.size() != 6 || field[5] != interface)
             continue;
-        const auto address = ParseDigits(field[0]);
-        unsigned length = 0;
-        if (address && ReadHex(field[2], length) && length <= kIpv6Bits)
-            addresses.push_back(Ipv6Text(*address) + "/" + std::to_string(length));
+        const auto address = ParseIpv6Digits(field[0]);
+        const auto length = ReadHexNumber(field[2]);
+        if (address && length && *length <= kIpv6Bits)
+            addresses.push_back(Ipv6Text(*address) + "/" + std::to_string(*length));
     }
     return addresses;
 }

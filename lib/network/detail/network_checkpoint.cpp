@@ -13,6 +13,7 @@
 #include "network/detail/folder_names.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/kernel_interface.h"
+#include "network/detail/live_card.h"
 #include "network/detail/process_identity.h"
 #include "network/detail/undo_action.h"
 #include "tavo_error.h"

@@ -1,30 +1,23 @@
-// The parts of the network that a checkpoint records.
+// The parts of the network that a checkpoint records: the steps that restore them.
 #include "network/detail/checkpoint.h"
 
-#include "core/detail/pid_file.h"
 #include "core/detail/shell_command.h"
 #include "core/detail/text_fields.h"
 #include "network/detail/connected_route.h"
 #include "network/detail/dhcp_client.h"
 #include "network/detail/file_state.h"
 #include "network/detail/interface_file.h"
-#include "network/detail/ipv6_text.h"
-#include "network/detail/kernel_interface.h"
+#include "network/detail/live_card.h"
 #include "network/detail/process_identity.h"
 
 #include <algorithm>
 #include <charconv>
-#include <cstring>
 
-#include <arpa/inet.h>
-#include <ifaddrs.h>
-#include <net/if.h>
 #include <net/route.h>
+#include <unistd.h>
 
 namespace tavo {
 namespace {
-
-constexpr const char *kIpv6Settings = "/proc/sys/net/ipv6/conf/";
 
 UndoStep FileStep(const FileState &file)
 {
@@ -61,85 +54,6 @@ std::string AddressCommand(const std::string &interface, const InterfaceAddress 
     return ShellCommand("/sbin/ifconfig %s %s netmask %s broadcast %s > /dev/null 2>&1", interface, own.address.Text(),
                         own.mask.Text(), Ipv4::FromWord(own.address.Word() | ~own.mask.Word()).Text())
         .value_or("");
-}
-
-bool IsUp(const std::string &interface)
-{
-    const std::string flags = InterfaceAttribute(interface, "flags");
-    unsigned value = 0;
-    const size_t start = flags.starts_with("0x") ? 2 : 0;
-    std::from_chars(flags.data() + start, flags.data() + flags.size(), value, 16);
-    return (value & IFF_UP) != 0;
-}
-
-std::vector<std::string> Ipv6Addresses(const std::string &interface)
-{
-    return ParseIpv6Table(ReadKernelFile("/proc/net/if_inet6").value_or(""), interface);
-}
-
-// All IPv4 addresses of an interface, the first one first.
-std::vector<InterfaceAddress> Addresses(const std::string &interface)
-{
-    std::vector<InterfaceAddress> found;
-    ifaddrs *all = nullptr;
-    if (::getifaddrs(&all) != 0)
-        return found;
-    const auto text = [](const sockaddr *address) {
-        sockaddr_in in;
-        std::memcpy(&in, address, sizeof in);
-        return Ipv4::FromWord(ntohl(in.sin_addr.s_addr));
-    };
-    for (const ifaddrs *one = all; one; one = one->ifa_next) {
-        const std::string_view label = one->ifa_name;  // "eth0:1" of an address with a label
-        if (one->ifa_addr && one->ifa_netmask && one->ifa_addr->sa_family == AF_INET &&
-            label.substr(0, label.find(':')) == interface)
-            found.push_back({text(one->ifa_addr), text(one->ifa_netmask)});
-    }
-    ::freeifaddrs(all);
-    return found;
-}
-
-std::string Ipv6OfHex(std::string_view hex)
-{
-    in6_addr address{};
-    for (size_t i = 0; i < sizeof address.s6_addr && hex.size() >= 2 * i + 2; ++i)
-        std::from_chars(hex.data() + 2 * i, hex.data() + 2 * i + 2, address.s6_addr[i], 16);
-    return Ipv6Text(address);
-}
-
-struct LiveIpv6Route {
-    std::string destination;  // "2001:db8::/32"
-    std::string gateway;      // empty for a network on the link
-};
-
-// Without those that come and go with an address or with the link itself.
-std::vector<LiveIpv6Route> LiveIpv6Routes(const std::string &interface)
-{
-    constexpr unsigned kernels_own = 0x80000000u | 0x00100000u;  // RTF_LOCAL, RTF_ANYCAST
-    constexpr std::string_view address_metric = "00000100";      // of the network that an address brings
-    std::vector<LiveIpv6Route> found;
-    // "DESTINATION LENGTH SOURCE LENGTH GATEWAY METRIC REFERENCES USES FLAGS INTERFACE", in hexadecimal
-    const std::string table = ReadKernelFile("/proc/net/ipv6_route").value_or("");
-    for (std::string_view rest = table; !rest.empty();) {
-        const auto field = SplitFields(TakeLine(rest));
-        unsigned flags = 0;
-        unsigned length = 0;
-        if (field.size() != 10 || field[9] != interface)
-            continue;
-        std::from_chars(field[8].data(), field[8].data() + field[8].size(), flags, 16);
-        std::from_chars(field[1].data(), field[1].data() + field[1].size(), length, 16);
-        if ((flags & kernels_own) != 0 || (!(flags & RTF_GATEWAY) && field[5] == address_metric) ||
-            field[0].starts_with("fe80") || field[0].starts_with("ff"))
-            continue;
-        found.push_back(
-            {Ipv6OfHex(field[0]) + "/" + std::to_string(length), flags & RTF_GATEWAY ? Ipv6OfHex(field[4]) : ""});
-    }
-    return found;
-}
-
-pid_t ClientOf(const std::string &interface)
-{
-    return HasDhcpClient(interface) ? ReadPidFile(DhcpPidFile(interface).c_str()).value_or(0) : 0;
 }
 
 }  // namespace
@@ -202,7 +116,7 @@ void Checkpoint::AddGateway()
 
 void Checkpoint::AddRoutes(const std::vector<Route> &routes, const std::string &interface)
 {
-    auto all = Addresses(interface);
+    auto all = LiveAddresses(interface);
     if (const auto first = AddressOf(interface))
         all.push_back(*first);
     const auto is_own_network = [&](const Route &route) {
@@ -231,11 +145,13 @@ void Checkpoint::AddCard(const std::string &interface)
 {
     const std::string file = InterfaceFile(interface);
     const bool dhcp = ReadSetting(file, "BOOTPROTO") == "dhcp";
-    const pid_t client = ClientOf(interface);
+    const pid_t client = DhcpClientOf(interface);
     const auto stored = StoredAddress(dhcp ? DhcpLeaseFile(interface) : file);
     const auto address = stored ? stored : AddressOf(interface);
 
     AddClientsEnd(interface, client);
+    if (LiveAddresses(interface).size() > 1)  // ifconfig would give its mask to one of the others
+        AddCommand(ShellCommand("/sbin/ip -4 addr flush dev %s > /dev/null 2>&1", interface).value_or(""));
     if (address)
         steps_.push_back({UndoStep::address, AddressCommand(interface, *address), {}, {}});
     else if (!IsUp(interface))
@@ -248,7 +164,7 @@ void Checkpoint::AddCard(const std::string &interface)
 
 void Checkpoint::AddFurtherAddresses(const std::string &interface)
 {
-    const std::vector<InterfaceAddress> addresses = Addresses(interface);
+    const std::vector<InterfaceAddress> addresses = LiveAddresses(interface);
     for (size_t i = 1; i < addresses.size(); ++i)
         AddCommand(ShellCommand("/sbin/ip addr add %s/%d dev %s > /dev/null 2>&1", addresses[i].address.Text(),
                                 PrefixLength(addresses[i].mask).value_or(32), interface)
@@ -257,8 +173,8 @@ void Checkpoint::AddFurtherAddresses(const std::string &interface)
 
 void Checkpoint::AddLiveCard(const std::string &interface)
 {
-    const pid_t client = ClientOf(interface);
-    const std::vector<InterfaceAddress> addresses = Addresses(interface);
+    const pid_t client = DhcpClientOf(interface);
+    const std::vector<InterfaceAddress> addresses = LiveAddresses(interface);
     steps_.push_back({UndoStep::card, interface, LiveCardText(interface), {}});
     AddClientsEnd(interface, client);
     AddCommand(ShellCommand("/sbin/ip -4 addr flush dev %s > /dev/null 2>&1", interface).value_or(""));
@@ -269,35 +185,19 @@ void Checkpoint::AddLiveCard(const std::string &interface)
                        .value_or(""));
     AddFurtherAddresses(interface);
     AddMtu(interface);
+    if (const std::string bits = LiveWakeBits(interface); !bits.empty())
+        steps_.push_back({UndoStep::wake, interface, bits, {}});
     // Switching it off takes every address and route away.
-    AddCommand(ShellCommand("/bin/echo 1 > %s%s%s", kIpv6Settings, interface, "/disable_ipv6").value_or(""));
+    AddCommand(ShellCommand("/bin/echo 1 > %s", Ipv6Switch(interface)).value_or(""));
     AddIpv6(interface);
     AddRoutes(LiveRoutes(), interface);
     if (client > 0)
         steps_.push_back({UndoStep::client, interface, {}, {}});
 }
 
-std::string LiveCardText(const std::string &interface)
-{
-    std::string text = InterfaceAttribute(interface, "mtu") + (IsUp(interface) ? " up" : " down") +
-                       (ClientOf(interface) > 0 ? " client\n" : "\n");
-    for (const InterfaceAddress &one : Addresses(interface))
-        text += one.address.Text() + "/" + one.mask.Text() + "\n";
-    for (const Route &route : LiveRoutes()) {
-        if (route.interface == interface)
-            text += RouteText(route) + "\n";
-    }
-    text += ReadKernelFile((kIpv6Settings + interface + "/disable_ipv6").c_str()).value_or("");
-    for (const std::string &address : Ipv6Addresses(interface))
-        text += address + "\n";
-    for (const LiveIpv6Route &route : LiveIpv6Routes(interface))
-        text += route.destination + " " + route.gateway + "\n";
-    return text;
-}
-
 void Checkpoint::AddIpv6Address(const std::string &interface, const std::string &address, int length)
 {
-    const auto addresses = Ipv6Addresses(interface);
+    const auto addresses = LiveIpv6Addresses(interface);
     const std::string both = address + "/" + std::to_string(length);
     const bool there = std::find(addresses.begin(), addresses.end(), both) != addresses.end();
     AddCommand(ShellCommand("/sbin/ip -6 addr %s %s/%d dev %s > /dev/null 2>&1", there ? "add" : "del", address, length,
@@ -308,13 +208,11 @@ void Checkpoint::AddIpv6Address(const std::string &interface, const std::string 
 
 void Checkpoint::AddIpv6(const std::string &interface)
 {
-    const auto off = ReadKernelFile((kIpv6Settings + interface + "/disable_ipv6").c_str());
+    const auto off = ReadKernelFile(Ipv6Switch(interface).c_str());
     if (!off)
         return;
-    AddCommand(ShellCommand("/bin/echo %s > %s%s%s", off->substr(0, 1), kIpv6Settings, interface, "/disable_ipv6")
-                   .value_or(""),
-               true);
-    for (const std::string &address : Ipv6Addresses(interface)) {
+    AddCommand(ShellCommand("/bin/echo %s > %s", off->substr(0, 1), Ipv6Switch(interface)).value_or(""), true);
+    for (const std::string &address : LiveIpv6Addresses(interface)) {
         if (!address.starts_with("fe80:"))
             AddCommand(ShellCommand("/sbin/ip -6 addr add %s dev %s > /dev/null 2>&1", address, interface).value_or(""),
                        true);

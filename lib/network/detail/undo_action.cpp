@@ -14,6 +14,7 @@
 #include "network/detail/folder_names.h"
 #include "network/detail/kernel_interface.h"
 #include "network/detail/process_identity.h"
+#include "network/detail/wake_on_lan.h"
 #include "tavo_file.h"
 
 #include <algorithm>
@@ -89,6 +90,15 @@ mode_t ToMode(const std::string &text)
     return mode;
 }
 
+void TellCard(const UndoStep &step)
+{
+    uint32_t bits = 0;
+    std::from_chars(step.value.data(), step.value.data() + step.value.size(), bits);
+    const auto now = GetWakeSettings(step.target.c_str());
+    if (now && now->enabled != bits)
+        SetWakeOptions(step.target.c_str(), bits);
+}
+
 bool IsLive(const std::string &route)
 {
     const auto live = LiveRoutes();
@@ -131,8 +141,11 @@ bool CarryOut(const UndoStep &step, bool cleared)
     case UndoStep::end_clients:
         EndClients(step);
         return true;
+    case UndoStep::wake:
+        TellCard(step);
+        return true;
     case UndoStep::client:
-        if (!HasDhcpClient(step.target))
+        if (DhcpClientOf(step.target) == 0)
             StartDhcpClient(step.target);
         return true;
     case UndoStep::structure:

@@ -9,7 +9,7 @@ namespace tavo {
 namespace {
 
 constexpr std::string_view kUndoEnd = "end\n";  // of a record that was written to its end
-constexpr std::string_view kUndoKinds = "fFosSOhcarednk";
+constexpr std::string_view kUndoKinds = "fFosSOhcarewdnk";
 
 std::optional<size_t> ReadLength(std::string_view text)
 {

@@ -25,6 +25,7 @@ struct UndoStep {
         route = 'r',          // the same; `value` is the route, as RouteText writes it
         end_clients =
             'e',       // DHCP clients of the interface `target` end, except the process `value` that began at `more`
+        wake = 'w',    // the card `target` wakes the appliance on the packets `value`, a number of WAKE_ bits
         client = 'd',  // the interface `target` has a DHCP client
         // Of a checkpoint of the whole network:
         structure =

@@ -7,6 +7,7 @@
 #include "network/detail/checkpoint.h"
 #include "network/detail/connected_route.h"
 #include "network/detail/dhcp_client.h"
+#include "network/detail/further_addresses.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/interface_name.h"
 #include "network/detail/ipv4_text.h"
@@ -119,9 +120,12 @@ int SetCard(const TAVONETCARD &card, const TAVONETCARD *previous)
     before.AddFile("/etc/resolv.conf");  // the client may write it
     before.AddCard(card.szInterface);
     before.Begin();
+    const tavo::FurtherAddresses further(card.szInterface);
     const int result = dhcp ? UseDhcp(card, before) : UseStatic(card, previous, before);
-    if (result != -1)
+    if (result != -1) {
+        further.PutBack();
         tavo::RepairRoutes(card.szInterface, dhcp);
+    }
     before.End();
     return result;
 }

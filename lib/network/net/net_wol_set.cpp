@@ -8,10 +8,13 @@
 #include "core/detail/lock_hold.h"
 #include "core/detail/log.h"
 #include "core/detail/open_file.h"
+#include "network/detail/checkpoint.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/interface_name.h"
 #include "network/detail/network_change.h"
 #include "network/detail/wake_on_lan.h"
+
+#include <optional>
 
 namespace {
 
@@ -41,20 +44,52 @@ int Store(const char *interface, const std::string &options)
                : ERR_SUCCESS;
 }
 
-bool TellCard(const char *interface, uint32_t bits)
+// Whether the card has to be told; empty when it does not answer or cannot do it.
+std::optional<bool> IsToBeTold(const char *interface, uint32_t bits)
 {
     const auto wake = tavo::GetWakeSettings(interface);
     if (!wake) {
         LogError("%s:%d Cannot get current wake-on-lan settings");
-        return false;
+        return std::nullopt;
     }
     if (wake->enabled == bits)
-        return true;
-    if ((bits & ~wake->supported) != 0 || !tavo::SetWakeOptions(interface, bits)) {
-        LogError("%s:%d Cannot set new wake-on-lan settings");
         return false;
+    if ((bits & ~wake->supported) != 0) {
+        LogError("%s:%d Cannot set new wake-on-lan settings");
+        return std::nullopt;
     }
     return true;
+}
+
+int TellCard(const char *interface, uint32_t bits)
+{
+    if (tavo::SetWakeOptions(interface, bits))
+        return ERR_SUCCESS;
+    LogError("%s:%d Cannot set new wake-on-lan settings");
+    return ERR_OP_FAILURE;
+}
+
+// Stored first: nobody takes back what the panel was told.
+int Set(const char *interface, bool on, const std::string &options, uint32_t bits)
+{
+    const bool by_panel = tavo::IsWokenByPanel();
+    if (by_panel && !on)
+        return Fail(ERR_OP_UNREGISTERED);  // the controller knows no word for it
+    const auto tells = by_panel ? std::optional(true) : IsToBeTold(interface, bits);
+    if (!tells)
+        return Fail(ERR_OP_FAILURE);
+    tavo::Checkpoint before;
+    before.AddSetting(kSettings, tavo::WakeOptionsKey(interface));
+    before.Begin();
+    int code = Store(interface, options);
+    if (code == 0 && *tells)
+        code = by_panel ? TellPanel() : TellCard(interface, bits);
+    if (code == 0) {
+        before.End();
+        return 0;
+    }
+    before.PutBack();
+    return Fail(code);
 }
 
 }  // namespace
@@ -74,17 +109,6 @@ extern "C" int TAVONetWolSet(const char *szInterface, int fEnable)
             LogError("%s:%d Miss wake-on-lan enable options.");
             return Fail(options.empty() ? ERR_KEY_NOT_FOUND : ERR_FORMAT_ERROR);
         }
-        return tavo::ChangeNetwork([&] {
-            if (tavo::IsWokenByPanel()) {
-                if (!fEnable)
-                    return Fail(ERR_OP_UNREGISTERED);  // the controller knows no word for it
-                if (const int code = TellPanel())
-                    return Fail(code);
-            } else if (!TellCard(szInterface, *bits)) {
-                return Fail(ERR_OP_FAILURE);
-            }
-            const int code = Store(szInterface, options);
-            return code == 0 ? 0 : Fail(code);
-        });
+        return tavo::ChangeNetwork([&] { return Set(szInterface, fEnable != 0, options, *bits); }, TAVO_LOCK_TAVOINFO);
     });
 }

@@ -2,10 +2,13 @@
 #include "network/detail/bonding.h"
 #include "network/detail/hosts_file.h"
 #include "network/detail/interface_name.h"
+#include "network/detail/ipv6_route_table.h"
 #include "network/detail/route_table.h"
 #include "network/detail/socket_table.h"
 
 #include <gtest/gtest.h>
+
+#include <string>
 
 namespace {
 
@@ -31,6 +34,34 @@ TEST(RouteTable, ReadsTheKernelsRows)
 
     EXPECT_FALSE(tavo::ParseRouteTable(""));
     EXPECT_FALSE(tavo::ParseRouteTable("Iface\tDestination\tGateway\n"));
+}
+
+// What is put back with an address or by the link itself is not listed, nor are rows of other interfaces and broken ones.
+TEST(Ipv6RouteTable, HasTheRoutesThatWereSet)
+{
+    const std::string none(32, '0');
+    const std::string db8 = "20010db8000000000000000000000000";
+    const std::string router = "20010db8000000000000000000000001";
+    const auto row = [&](const std::string &net, const std::string &rest) {
+        return net + " " + rest + "\n";
+    };
+    const std::string table =
+        row(none, "00 " + none + " 00 " + router + " 00000400 00000001 00000000 00000003     eth0") +
+        row(db8, "30 " + none + " 00 " + none + " 00000400 00000001 00000000 00000001     eth0") +
+        row(db8, "40 " + none + " 00 " + none + " 00000100 00000001 00000000 00000001     eth0") +
+        row(db8, "40 " + none + " 00 " + router + " 00000100 00000001 00000000 00000003     eth0") +
+        row(router, "80 " + none + " 00 " + none + " 00000000 00000002 00000000 80200001     eth0") +
+        row(db8, "80 " + none + " 00 " + none + " 00000000 00000002 00000000 00100001     eth0") +
+        row("fe80" + none.substr(4), "40 " + none + " 00 " + none + " 00000400 00000001 00000000 00000001 eth0") +
+        row("ff00" + none.substr(4), "08 " + none + " 00 " + none + " 00000400 00000001 00000000 00000001 eth0") +
+        row(none, "00 " + none + " 00 " + router + " 00000400 00000001 00000000 00000003     eth1") +
+        row(db8, "81 " + none + " 00 " + none + " 00000400 00000001 00000000 00000001     eth0") +
+        row(db8.substr(1), "30 " + none + " 00 " + none + " 00000400 00000001 00000000 00000001     eth0") +
+        row(db8, "30 " + none + " 00 " + none + " 00000400 00000001 00000000 0000000x     eth0");
+    std::string found;
+    for (const tavo::LiveIpv6Route &route : tavo::ParseIpv6RouteTable(table, "eth0"))
+        found += route.destination + " via " + route.gateway + "\n";
+    EXPECT_EQ(found, "::/0 via 2001:db8::1\n2001:db8::/48 via \n2001:db8::/64 via 2001:db8::1\n");
 }
 
 TEST(SocketTable, FindsTheLocalPort)

@@ -2,6 +2,7 @@
 #include "tavo_net.h"
 
 #include "network/card_record.h"
+#include "network/network_state.h"
 #include "support/container_text.h"
 #include "support/fault_state.h"
 #include "support/network_scene.h"
@@ -12,8 +13,6 @@
 #include <filesystem>
 #include <optional>
 
-#include <arpa/inet.h>
-#include <netdb.h>
 #include <netinet/in.h>
 #include <sys/socket.h>
 #include <sys/utsname.h>
@@ -22,6 +21,7 @@
 using test::Card;
 using test::kIfcfg;
 using test::Node;
+using test::OwnAddress;
 using test::ReadFile;
 using testing::AllOf;
 using testing::Contains;
@@ -49,22 +49,6 @@ std::string LiveGateway()
 {
     char text[20] = "";
     return TAVONetDefaultGatewayGet(text, sizeof text) == 0 ? text : "none";
-}
-
-// What the C library finds under the appliance's own name.
-std::string OwnAddress()
-{
-    char name[256] = "";
-    ::gethostname(name, sizeof name - 1);
-    addrinfo hints{};
-    hints.ai_family = AF_INET;
-    addrinfo *found = nullptr;
-    if (::getaddrinfo(name, nullptr, &hints, &found) != 0)
-        return "none";
-    sockaddr_in address;
-    std::memcpy(&address, found->ai_addr, sizeof address);
-    ::freeaddrinfo(found);
-    return ::inet_ntoa(address.sin_addr);
 }
 
 TEST_F(Kernel, KnowsItsOwnNameAtAnyTime)
@@ -121,6 +105,35 @@ TEST_F(Kernel, HasTheAddressAndTheRoutesThatWereSet)
     EXPECT_THAT(here_->Output("ip route"),
                 AllOf(HasSubstr("default via 192.0.2.99"), HasSubstr("192.0.2.0/25 dev eth0")));
     EXPECT_EQ(here_->Shell("ping -c 1 -w 5 192.0.2.99 >/dev/null"), 0);
+}
+
+// ifconfig sets a mask where the kernel has the first address just then, which may be another one.
+TEST_F(Kernel, KeepsFurtherAddressesBesideANewFirstOne)
+{
+    EXPECT_TRUE(here_->Run([] {
+        const TAVONETCARD old = Card(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0");
+        EXPECT_EQ(TAVONetSetCard1(&old, nullptr), 0);
+        EXPECT_EQ(test::ShellStatus("ip addr add 203.0.113.1/29 dev eth0 && ip addr add 192.0.2.21/24 dev eth0 && "
+                                    "ip route add 233.252.0.0/24 via 203.0.113.2"),
+                  0);
+        const auto has = [](const char *address) {
+            for (const std::string rest : {"203.0.113.1/29", "192.0.2.21/24"})
+                EXPECT_EQ(test::ShellStatus("ip addr show dev eth0 | grep -q ' " + rest + " '"), 0) << rest;
+            EXPECT_EQ(test::ShellStatus("[ $(ip addr show dev eth0 | grep -c 'inet ') = 3 ]"), 0);
+            EXPECT_EQ(test::ShellStatus("ip route | grep -q '^233.252.0.0/24 via 203.0.113.2 dev eth0'"), 0);
+            TAVONETCARD card;
+            EXPECT_EQ(TAVONetGetCard1(&card), 0);
+            EXPECT_EQ(std::string(card.szIp) + "/" + card.szMask, address);
+        };
+        const TAVONETCARD wanted = Card(TAVO_NET_STATIC, "192.0.2.130", "255.255.255.192");
+        EXPECT_EQ(TAVONetSetCard1(&wanted, nullptr), 0);
+        has("192.0.2.130/255.255.255.192");
+        // The client fails: there is none here.
+        const TAVONETCARD lease = Card(TAVO_NET_DHCP);
+        EXPECT_EQ(TAVONetSetCard1(&lease, nullptr), -1);
+        has("192.0.2.130/255.255.255.192");
+        return true;
+    }));
 }
 
 TEST_F(Kernel, HasTheGatewayOrTheOldOne)

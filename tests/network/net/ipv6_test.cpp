@@ -36,6 +36,7 @@ struct Wake {
     uint32_t enabled = 0;
     int sets = 0;
     bool answers = true;
+    bool obeys = true;
 
     int Answer(ifreq *ask)
     {
@@ -50,6 +51,8 @@ struct Wake {
             std::memcpy(ask->ifr_data, &info, sizeof info);
             return 0;
         }
+        if (!obeys)
+            return -1;
         ++sets;
         enabled = info.wolopts;
         return info.cmd == ETHTOOL_SWOL ? 0 : -1;
@@ -190,6 +193,29 @@ TEST_F(NetIPv6, SetsTheWakeUpPacketsOfACard)
     EXPECT_THAT(ReadFile(kTavoinfo), EndsWith("eth0_wol_options=d\n"));
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
     EXPECT_THAT(log_.Texts(), IsEmpty());
+}
+
+// Stored and told, or neither; also when it is a part of a larger change.
+TEST_F(NetIPv6, WakeOnLanIsPutBack)
+{
+    const std::string before = ReadFile(kTavoinfo);
+    wake_.obeys = false;
+    EXPECT_EQ(TAVONetWolSet("eth0", 1), -1);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_wol_set"}));
+    EXPECT_EQ(ReadFile(kTavoinfo), before);
+    wake_.obeys = true;
+    {
+        const test::LockHolder other(TAVO_LOCK_TAVOINFO | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING);
+        EXPECT_EQ(TAVONetWolSet("eth0", 1), -1);
+        EXPECT_EQ(TLIBErrGet(), ERR_LOCK_FAILED);
+        EXPECT_EQ(wake_.enabled, 0u);
+    }
+    EXPECT_EQ(TAVONetCheckpointTake(), 0);
+    EXPECT_EQ(TAVONetWolSet("eth0", 1), 0);
+    EXPECT_EQ(wake_.enabled, uint32_t{WAKE_MAGIC});
+    EXPECT_EQ(TAVONetCheckpointPutBack(), 0);
+    EXPECT_EQ(wake_.enabled, 0u);
+    EXPECT_EQ(ReadFile(kTavoinfo), before);
 }
 
 TEST_F(NetIPv6, WhatCannotWakeSaysWhy)
