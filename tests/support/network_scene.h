@@ -43,14 +43,19 @@ class ScriptedClient {
     explicit ScriptedClient(std::string_view script)
     {
         scenario_.InAnyOrder();
-        for (const char *tool : {"ifconfig", "route"})
-            scenario_.ExpectAny(std::string("/sbin/") + tool)
-                .AnyTimes()
-                .Runs(std::string("#!/bin/sh\nexec /bin/busybox ") + tool + " \"$@\"\n");
-        scenario_.ExpectAny("/sbin/dhcpcd").AnyTimes().Runs(script);
+        for (const char *tool : {"ifconfig", "route", "ip"})
+            Expect(tool, std::string("#!/bin/sh\nexec /bin/busybox ") + tool + " \"$@\"\n");
+        Expect("dhcpcd", script);
     }
 
   private:
+    // The library names the whole path, the start script does not.
+    void Expect(const std::string &tool, std::string_view script)
+    {
+        for (const char *folder : {"/sbin/", ""})
+            scenario_.ExpectAny(folder + tool).AnyTimes().Runs(script);
+    }
+
     Scenario scenario_;
 };
 

@@ -1,44 +1,33 @@
 // tavoctl net apply and export: a document becomes the network, once; all of it or nothing.
-#include "tools/tavoctl/run_tavoctl.h"
+#include "net_scene.h"
 
 #include "tavo_net.h"
 
 #include "support/eventually.h"
 #include "support/rounds.h"
-#include "support/scratch_dir.h"
-#include "support/virtual_cable.h"
 
 #include <gmock/gmock.h>
 
 #include <filesystem>
-#include <optional>
 #include <random>
+#include <span>
 
 using nlohmann::json;
 using test::Node;
 using test::Ran;
 using test::ReadFile;
 using test::Tavoctl;
-using test::VirtualCable;
 using test::WriteFile;
 using testing::HasSubstr;
 
 namespace {
 
-constexpr const char *kScripts = "/etc/sysconfig/network-scripts/";
 constexpr const char *kFile = "/tmp/net.json";
-
-std::string Output(const std::string &command)
-{
-    const test::ScratchDir dir;
-    test::ShellStatus("{ " + command + "; } >" + (dir / "out") + " 2>/dev/null");
-    return ReadFile(dir / "out");
-}
 
 // All of the files, and what the kernel has.
 std::string Network()
 {
-    return Output(
+    return test::Output(
         "cd /etc && for f in hosts resolv.conf tavoinfo.conf sysconfig/network sysconfig/network-scripts/*; do "
         "echo == $f; cat $f; done; hostname; ip -4 route | sort; ip -6 route | grep -v '^fe80\\|^ff' | sort; "
         "for n in /sys/class/net/*; do echo ${n##*/} $(cat $n/mtu); ip addr show dev ${n##*/} | grep inet | "
@@ -67,24 +56,16 @@ json Document(const char *text)
     return document;
 }
 
-class NetApply : public testing::Test {
+class NetApply : public test::NetScene {
   protected:
     void SetUp() override
     {
-        if (const std::string missing = VirtualCable::Missing(); !missing.empty())
-            GTEST_SKIP() << missing;
-        if (test::RootLacks("foreign-exec"))
-            GTEST_SKIP() << "runs tavoctl";
-        cable_.emplace("cable");
-        here_.emplace("here");
-        cable_->Plug(*here_, "eth0");
+        NetScene::SetUp();
+        if (IsSkipped())
+            return;
         cable_->Plug(*here_, "eth1");
         EXPECT_TRUE(here_->Run([] {
-            WriteFile(kScripts + std::string("ifcfg-eth0"),
-                      "# the rack\nDEVICE=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.10\n"
-                      "NETMASK=255.255.255.0\nONBOOT=yes\n");
-            std::filesystem::remove(kScripts + std::string("ifcfg-eth1"));
-            WriteFile("/etc/sysconfig/network", "HOSTNAME=here\nGATEWAY=192.0.2.1\n");
+            std::filesystem::remove(test::kScripts + std::string("ifcfg-eth1"));
             WriteFile("/etc/resolv.conf", "nameserver 192.0.2.53\n");
             EXPECT_EQ(test::ShellStatus("/etc/rc.network start"), 0);
             EXPECT_EQ(TAVONetHostsRefresh(), 0);
@@ -101,54 +82,11 @@ class NetApply : public testing::Test {
                (has_ipv6_ || document.find("2001:") == std::string::npos);
     }
 
-    std::optional<VirtualCable> cable_;
-    std::optional<Node> here_;
-    bool has_vlans_ = false;
-    bool has_ipv6_ = false;
-};
-
-// Each builds on what the ones before it made.
-const char *const kDocuments[] = {
-    R"({})",
-    R"({"hostname": "attic"})",
-    R"({"hostname": "cellar", "dns": ["192.0.2.54"]})",
-    R"({"dns": ["2001:db8::53", "192.0.2.53"], "search": ["example.com", "lab.example.com"]})",
-    R"({"dns": []})",
-    R"({"search": []})",
-    R"({"dns": ["192.0.2.53"], "search": ["example.net"]})",
-    R"({"cards": [{"name": "eth0", "address": "192.0.2.20/25"}]})",
-    R"({"cards": [{"name": "eth0", "mode": "static", "address": "192.0.2.10/24"}], "gateway": "192.0.2.2"})",
-    R"({"gateway": null})",
-    R"({"gateway": "192.0.2.1"})",
-    R"({"cards": [{"name": "eth1", "address": "198.51.100.5/24"}]})",
-    R"({"cards": [{"name": "eth1", "more_addresses": ["203.0.113.6/24", "198.51.100.6/24"]}]})",
-    R"({"cards": [{"name": "eth1", "more_addresses": ["203.0.113.6/24"], "mtu": 1400}]})",
-    R"({"cards": [{"name": "eth1", "routes": ["233.252.0.0/24 via 198.51.100.1", "233.252.1.0/24"]}]})",
-    R"({"cards": [{"name": "eth1", "address": "198.51.100.9/24"}]})",
-    R"({"cards": [{"name": "eth1", "address": "203.0.113.6/24", "more_addresses": ["198.51.100.9/24"]}]})",
-    R"({"cards": [{"name": "eth1", "routes": []}]})",
-    R"({"cards": [{"name": "eth0", "ipv6": true, "ipv6_addresses": ["2001:db8::20/64", "2001:db8:0::10/64"]}]})",
-    R"({"cards": [{"name": "eth0", "ipv6_gateway": "2001:db8::1", "routes": ["2001:db8:9::/48 via 2001:db8::2"]}]})",
-    R"({"cards": [{"name": "eth0", "ipv6_addresses": ["2001:db8::20/64"]}]})",
-    R"({"cards": [{"name": "eth0", "ipv6_gateway": null, "routes": []}]})",
-    R"({"cards": [{"name": "eth0", "ipv6_addresses": []}]})",
-    R"({"cards": [{"name": "eth0.7", "parent": "eth0", "vlan": 7, "address": "198.51.101.7/24"}]})",
-    R"({"cards": [{"name": "eth0.7", "parent": "eth0", "vlan": 8, "more_addresses": ["198.51.101.8/24"], "mtu": 1400}]})",
-    R"({"cards": [{"name": "vlan9", "parent": "eth1", "vlan": 9, "mode": "none"}, {"name": "eth0.7", "absent": true}]})",
-    R"({"cards": [{"name": "vlan9", "absent": true}]})",
-    R"({"cards": [{"name": "eth1", "mode": "none", "more_addresses": [], "mtu": 1500}]})",
-    R"({"cards": [{"name": "eth0", "mode": "static", "address": "192.0.2.30/24", "ipv6": false}]})",
-    R"({"hostname": "here", "gateway": "192.0.2.3", "dns": ["192.0.2.55"], "search": ["example.org"], "cards": [
-        {"name": "eth0", "address": "192.0.2.10/26", "more_addresses": ["203.0.113.1/29"],
-         "routes": ["233.252.0.0/24 via 192.0.2.4"], "mtu": 1450},
-        {"name": "eth1", "address": "198.51.100.5/24"}]})",
-};
-
-TEST_F(NetApply, ADocumentAppliedTwiceChangesNothingTheSecondTime)
-{
-    EXPECT_TRUE(here_->Run([&] {
+    // One after the other, each twice. False after the first failure.
+    bool ApplyEachTwice(std::span<const char *const> documents) const
+    {
         int number = 0;
-        for (const char *text : kDocuments) {
+        for (const char *text : documents) {
             ++number;
             if (!CanDo(text))
                 continue;
@@ -178,12 +116,126 @@ TEST_F(NetApply, ADocumentAppliedTwiceChangesNothingTheSecondTime)
             const Ran again = Apply(json::parse(exported.out));
             EXPECT_EQ(again.status, 0) << text << again << exported;
             EXPECT_EQ(json::parse(again.out).at("changed"), false) << text << again << exported;
+
+            // The start script keeps all of it.
+            EXPECT_EQ(test::ShellStatus("/etc/rc.network stop && /etc/rc.network start"), 0);
+            EXPECT_TRUE(test::Eventually([&] { return Network() == after; })) << text << Network() << "\nbefore:\n"
+                                                                              << after;
             if (HasFailure())
                 return false;
         }
-        // The start script keeps all of it.
+        return true;
+    }
+
+    bool has_vlans_ = false;
+    bool has_ipv6_ = false;
+};
+
+// Each builds on what the ones before it made.
+const char *const kDocuments[] = {
+    R"({})",
+    R"({"hostname": "attic"})",
+    R"({"hostname": "cellar", "dns": ["192.0.2.54"]})",
+    R"({"dns": ["2001:db8::53", "192.0.2.53"], "search": ["example.com", "lab.example.com"]})",
+    R"({"dns": []})",
+    R"({"search": []})",
+    R"({"dns": ["192.0.2.53"], "search": ["example.net"]})",
+    R"({"cards": [{"name": "eth0", "address": "192.0.2.20/25"}]})",
+    R"({"cards": [{"name": "eth0", "mode": "static", "address": "192.0.2.10/24"}], "gateway": "192.0.2.2"})",
+    R"({"gateway": null})",
+    R"({"gateway": "192.0.2.1"})",
+    R"({"cards": [{"name": "eth1", "more_addresses": ["203.0.113.6/24"]}]})",
+    R"({"cards": [{"name": "eth1", "address": "198.51.100.5/24"}]})",
+    R"({"cards": [{"name": "eth1", "more_addresses": ["203.0.113.6/24", "198.51.100.6/24"]}]})",
+    R"({"cards": [{"name": "eth1", "more_addresses": ["203.0.113.6/24"], "mtu": 1400}]})",
+    R"({"cards": [{"name": "eth1", "routes": ["233.252.0.0/24 via 198.51.100.1", "233.252.1.0/24"]}]})",
+    R"({"cards": [{"name": "eth1", "address": "198.51.100.9/24"}]})",
+    R"({"cards": [{"name": "eth1", "address": "203.0.113.6/24", "more_addresses": ["198.51.100.9/24"]}]})",
+    R"({"cards": [{"name": "eth1", "routes": []}]})",
+    R"({"cards": [{"name": "eth0", "ipv6": true, "ipv6_addresses": ["2001:db8::20/64", "2001:db8:0::10/64"]}]})",
+    R"({"cards": [{"name": "eth0", "ipv6_gateway": "2001:db8::1", "routes": ["2001:db8:9::/48 via 2001:db8::2"]}]})",
+    R"({"cards": [{"name": "eth0", "ipv6_addresses": ["2001:db8::20/64"]}]})",
+    R"({"cards": [{"name": "eth0", "ipv6_gateway": null, "routes": []}]})",
+    R"({"cards": [{"name": "eth0", "ipv6_addresses": []}]})",
+    R"({"cards": [{"name": "eth0.7", "parent": "eth0", "vlan": 7, "address": "198.51.101.7/24"}]})",
+    R"({"cards": [{"name": "eth0.7", "parent": "eth0", "vlan": 8, "more_addresses": ["198.51.101.8/24"], "mtu": 1400}]})",
+    R"({"cards": [{"name": "vlan9", "parent": "eth1", "vlan": 9, "mode": "none"}, {"name": "eth0.7", "absent": true}]})",
+    R"({"cards": [{"name": "vlan9", "absent": true}]})",
+    R"({"cards": [{"name": "eth1", "mode": "none", "more_addresses": [], "mtu": 1500}]})",
+    R"({"cards": [{"name": "eth0", "mode": "static", "address": "192.0.2.30/24", "ipv6": false}]})",
+    R"({"hostname": "here", "gateway": "192.0.2.3", "dns": ["192.0.2.55"], "search": ["example.org"], "cards": [
+        {"name": "eth0", "address": "192.0.2.10/26", "more_addresses": ["203.0.113.1/29"],
+         "routes": ["233.252.0.0/24 via 192.0.2.4"], "mtu": 1450},
+        {"name": "eth1", "address": "198.51.100.5/24"}]})",
+};
+
+const char *const kBondDocuments[] = {
+    R"({})",
+    R"({"cards": [{"name": "bond0", "bond": "backup", "members": ["eth0", "eth1"], "address": "192.0.2.10/26"}]})",
+    R"({"cards": [{"name": "bond0", "more_addresses": ["203.0.113.1/29"], "routes": ["233.252.0.0/24 via 192.0.2.4"]}]})",
+    R"({"cards": [{"name": "bond0", "bond": "adaptive", "members": ["eth1", "eth0"]}]})",
+    R"({"cards": [{"name": "bond0", "absent": true}]})",
+};
+
+const char *const kLeaseDocuments[] = {
+    R"({})",
+    R"({"cards": [{"name": "eth0", "mode": "dhcp"}]})",
+    R"({"gateway": "192.0.2.7", "cards": [{"name": "eth0", "more_addresses": ["203.0.113.1/29"], "mtu": 1400}]})",
+    R"({"hostname": "attic", "cards": [{"name": "eth1", "mode": "dhcp", "routes": ["233.252.0.0/24 via 198.51.100.1"]}]})",
+    R"({"cards": [{"name": "vlan7", "parent": "eth1", "vlan": 7, "mode": "dhcp"}]})",
+    R"({"cards": [{"name": "vlan7", "absent": true}]})",
+    R"({"cards": [{"name": "eth1", "mode": "none", "routes": []}, {"name": "eth0", "ipv6_addresses": ["2001:db8::20/64"]}]})",
+    R"({"gateway": "192.0.2.1", "cards": [{"name": "eth0", "mode": "static", "address": "192.0.2.10/24"}]})",
+    R"({"cards": [{"name": "eth0", "mode": "dhcp", "more_addresses": []}]})",
+};
+
+// Gets a lease at once and is never seen again.
+constexpr const char *kClient = R"(#!/bin/sh
+case $2 in
+eth0) address=192.0.2.40 router=192.0.2.98 ;;
+eth1) address=198.51.100.40 router= ;;
+*) address=198.51.101.40 router= ;;
+esac
+busybox ifconfig "$2" $address netmask 255.255.255.0
+[ ! "$router" ] || busybox route add default gw $router
+printf 'IPADDR=%s\nNETMASK=255.255.255.0\nGATEWAY=%s\n' $address "$router" >/etc/dhcpc/dhcpcd-"$2".info
+)";
+
+TEST_F(NetApply, ADocumentAppliedTwiceChangesNothingTheSecondTime)
+{
+    EXPECT_TRUE(here_->Run([&] { return ApplyEachTwice(kDocuments); }));
+}
+
+TEST_F(NetApply, ABondAppliedTwiceChangesNothingTheSecondTime)
+{
+    // The start script makes them by /sys.
+    if (here_->Shell("mount -o remount,rw /sys && [ -w /sys/class/net/bonding_masters ]") != 0)
+        GTEST_SKIP() << "this kernel has no bonds";
+    EXPECT_TRUE(here_->Run([&] { return ApplyEachTwice(kBondDocuments); }));
+}
+
+TEST_F(NetApply, ALeaseAppliedTwiceChangesNothingTheSecondTime)
+{
+    const test::ScriptedClient client(kClient);
+    EXPECT_TRUE(here_->Run([&] {
+        std::filesystem::create_directories("/etc/dhcpc");
+        return ApplyEachTwice(kLeaseDocuments);
+    }));
+}
+
+// The panel of this model wakes it. It knows no word for the way back: then the document is not applied at all.
+TEST_F(NetApply, AWakingCardAppliedTwiceIsToldOnce)
+{
+    EXPECT_TRUE(here_->Run([&] {
+        WriteFile("/etc/tavoinfo.conf", "support_wol=\"yes\"\nwol_enabled_options=\"g\"\n");
+        WriteFile("/etc.defaults/tavoinfo.conf", ReadFile("/etc.defaults/tavoinfo.conf") + "wol_by_panel=\"yes\"\n");
+        WriteFile("/dev/ttyS1", "");
+        const char *const documents[] = {R"({})", R"({"cards": [{"name": "eth0", "wake_on_lan": true}]})"};
+        EXPECT_TRUE(ApplyEachTwice(documents));
+        EXPECT_EQ(ReadFile("/dev/ttyS1"), "l\n");
         const std::string before = Network();
-        EXPECT_EQ(test::ShellStatus("/etc/rc.network stop && /etc/rc.network start"), 0);
+        const Ran ran = Apply(Document(R"({"hostname": "attic", "cards": [{"name": "eth0", "wake_on_lan": false}]})"));
+        EXPECT_EQ(ran.status, 1) << ran;
         EXPECT_EQ(Network(), before);
         return true;
     }));

@@ -1,12 +1,10 @@
 // tavoctl net and discover on cards of a kernel: what they show, refuse and change, and what they put back.
-#include "tools/tavoctl/run_tavoctl.h"
+#include "net_scene.h"
 
 #include "tavo_net.h"
 
 #include "support/eventually.h"
 #include "support/rounds.h"
-#include "support/scratch_dir.h"
-#include "support/virtual_cable.h"
 
 #include <gmock/gmock.h>
 
@@ -21,6 +19,10 @@
 #include <sys/socket.h>
 
 using test::Eventually;
+using test::kIfcfg;
+using test::kNetwork;
+using test::kOldFile;
+using test::kOldNetwork;
 using test::Node;
 using test::Ran;
 using test::ReadFile;
@@ -33,57 +35,47 @@ using testing::HasSubstr;
 
 namespace {
 
-constexpr const char *kIfcfg = "/etc/sysconfig/network-scripts/ifcfg-eth0";
-constexpr const char *kNetwork = "/etc/sysconfig/network";
 constexpr const char *kTrial = "/var/run/tavo-net-trial.pid";
-
-// As an administrator wrote them: with a comment, and not in the order of the library.
-constexpr const char *kOldFile = "# the rack\nIPADDR=192.0.2.10\nDEVICE=eth0\nNETMASK=255.255.255.0\nONBOOT=yes\n"
-                                 "BOOTPROTO=static\n";
-constexpr const char *kOldNetwork = "HOSTNAME=here\nGATEWAY=192.0.2.1\n";
 
 // What the kernel says of eth0 and the way out.
 std::string Live()
 {
-    const test::ScratchDir dir;
-    test::ShellStatus("ip -4 addr show dev eth0 | grep inet >" + (dir / "live") + "; ip route | grep default >>" +
-                      (dir / "live"));
-    return ReadFile(dir / "live");
+    return test::Output("ip -4 addr show dev eth0 | grep inet; ip route | grep default");
 }
 
-class Net : public testing::Test {
+// The appliance's address is in the kernel, too, and a neighbour has another one.
+class Net : public test::NetScene {
   protected:
     void SetUp() override
     {
-        if (const std::string missing = VirtualCable::Missing(); !missing.empty())
-            GTEST_SKIP() << missing;
-        if (test::RootLacks("foreign-exec"))
-            GTEST_SKIP() << "runs tavoctl";
-        cable_.emplace("cable");
+        NetScene::SetUp();
+        if (IsSkipped())
+            return;
         there_.emplace("there");
         cable_->Plug(*there_, "eth0");
         ASSERT_EQ(there_->Shell("ifconfig eth0 192.0.2.99 netmask 255.255.255.0 up"), 0);
-        here_ = NewNode("here", 10);
+        Start(*here_);
     }
 
-    std::unique_ptr<Node> NewNode(const std::string &name, int last)
+    static void Start(const Node &node)
+    {
+        EXPECT_EQ(node.Shell("ifconfig eth0 192.0.2.10 netmask 255.255.255.0 up && route add default gw 192.0.2.1"), 0);
+    }
+
+    // Another appliance with the same settings.
+    std::unique_ptr<Node> Twin(const std::string &name)
     {
         auto node = std::make_unique<Node>(name);
         cable_->Plug(*node, "eth0");
-        EXPECT_TRUE(node->Run([&] {
-            WriteFile(kIfcfg, kOldFile);
-            WriteFile(kNetwork, kOldNetwork);
-            EXPECT_EQ(test::ShellStatus("ifconfig eth0 192.0.2." + std::to_string(last) +
-                                        " netmask 255.255.255.0 up; route add default gw 192.0.2.1"),
-                      0);
+        EXPECT_TRUE(node->Run([] {
+            test::WriteOldFiles();
             return true;
         }));
+        Start(*node);
         return node;
     }
 
-    std::optional<VirtualCable> cable_;
     std::optional<Node> there_;
-    std::unique_ptr<Node> here_;
 };
 
 TEST_F(Net, ShowsWhatWasSet)
@@ -208,19 +200,21 @@ TEST_F(Net, TakesNoAddressOfAnotherHost)
 TEST_F(Net, ShowsWhichPortsAreTaken)
 {
     EXPECT_TRUE(here_->Run([] {
-        const int fd = ::socket(AF_INET6, SOCK_STREAM | SOCK_CLOEXEC, 0);
-        if (fd < 0)
-            return true;  // no IPv6 here
-        sockaddr_in6 where{};
-        where.sin6_family = AF_INET6;
-        where.sin6_port = htons(5121);
-        EXPECT_EQ(::bind(fd, reinterpret_cast<const sockaddr *>(&where), sizeof where), 0);
-        EXPECT_EQ(::listen(fd, 1), 0);
-        const Ran used = Tavoctl({"net", "check-port", "5121"});
-        EXPECT_EQ(used.status, 4) << used;
-        EXPECT_EQ(used.out, "used\n");
-        EXPECT_THAT(Tavoctl({"net", "check-port", "--json", "5122"}).out, HasSubstr(R"("used": false)"));
-        ::close(fd);
+        for (const int type : {SOCK_STREAM, SOCK_DGRAM}) {
+            const int fd = ::socket(AF_INET6, type | SOCK_CLOEXEC, 0);
+            if (fd < 0)
+                return true;  // no IPv6 here
+            sockaddr_in6 where{};
+            where.sin6_family = AF_INET6;
+            where.sin6_port = htons(5121);
+            EXPECT_EQ(::bind(fd, reinterpret_cast<const sockaddr *>(&where), sizeof where), 0);
+            EXPECT_EQ(type == SOCK_STREAM ? ::listen(fd, 1) : 0, 0);
+            const Ran used = Tavoctl({"net", "check-port", "5121"});
+            EXPECT_EQ(used.status, 4) << used;
+            EXPECT_EQ(used.out, "used\n");
+            EXPECT_THAT(Tavoctl({"net", "check-port", "--json", "5122"}).out, HasSubstr(R"("used": false)"));
+            ::close(fd);
+        }
         return true;
     }));
 }
@@ -318,16 +312,12 @@ TEST_F(Net, ATrialPutsTheWholeNetworkBack)
         WriteFile("/etc/resolv.conf", "nameserver 192.0.2.53\n");
         EXPECT_EQ(TAVONetHostsRefresh(), 0);
         const auto all = [] {
-            std::string text = Live() + ReadFile("/etc/resolv.conf") + ReadFile("/etc/tavoinfo.conf") +
-                               ReadFile("/etc/hosts") + ReadFile(kIfcfg) + ReadFile(kNetwork);
-            const test::ScratchDir dir;
-            test::ShellStatus("{ ip route; ip -4 addr show dev eth1 | grep inet; ip -6 addr show dev eth0 scope global "
-                              "| grep inet6 | "
-                              "sed 's/ tentative//'; "
-                              "ip -6 route show dev eth0 | grep via; cat /sys/class/net/eth0/mtu; hostname; "
-                              "ls /etc/sysconfig/network-scripts; } >" +
-                              (dir / "all"));
-            return text + ReadFile(dir / "all");
+            const std::string text = Live() + ReadFile("/etc/resolv.conf") + ReadFile("/etc/tavoinfo.conf") +
+                                     ReadFile("/etc/hosts") + ReadFile(kIfcfg) + ReadFile(kNetwork);
+            return text +
+                   test::Output("ip route; ip -4 addr show dev eth1 | grep inet; ip -6 addr show dev eth0 scope "
+                                "global | grep inet6 | sed 's/ tentative//'; ip -6 route show dev eth0 | grep via; "
+                                "cat /sys/class/net/eth0/mtu; hostname; ls /etc/sysconfig/network-scripts");
         };
         const auto change = [] {
             EXPECT_EQ(TAVOLnxSetHostname("attic"), 0);
@@ -407,7 +397,7 @@ TEST_F(Net, AKilledTrialPutsTheOldSettingsBack)
     constexpr int nodes = 4;
     std::vector<std::unique_ptr<Node>> others;
     for (int i = 0; i < nodes; ++i)
-        others.push_back(NewNode("node" + std::to_string(i), 10));
+        others.push_back(Twin("node" + std::to_string(i)));
     const int rounds = test::Rounds(104) / nodes + 1;
     std::vector<pid_t> running;
     for (int i = 0; i < nodes; ++i) {

@@ -132,6 +132,7 @@ class CardSteps {
 
     void Apply()
     {
+        Begin();
         if (Wants("mtu"))
             Must(TAVONetSetMTUValue(name_.c_str(), std::stoi(wanted_.at("mtu").Text())) == 0,
                  "set the MTU of " + name_);
@@ -171,6 +172,20 @@ class CardSteps {
             return true;
         const NetFactsMap live = Live();
         return live.contains(fact) && !(live.at(fact) == want->second);
+    }
+
+    // The start script passes over a card without a file.
+    void Begin() const
+    {
+        const std::string file = InterfaceFileOf(name_);
+        if (!NetSetting(file, "DEVICE").empty() ||
+            std::none_of(wanted_.begin(), wanted_.end(), [&](const auto &fact) { return Wants(fact.first.c_str()); }))
+            return;
+        SetKey(file, "DEVICE", name_);
+        SetKey(file, "ONBOOT", "yes");
+        if (NetSetting(file, "BOOTPROTO").empty())
+            SetKey(file, "BOOTPROTO", "none");
+        Run("/sbin/ifconfig " + name_ + " up", "start " + name_);
     }
 
     void SetMode() const
