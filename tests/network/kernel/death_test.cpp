@@ -3,7 +3,8 @@
 #include "tavo_net.h"
 
 #include "network/card_record.h"
-#include "support/container_text.h"
+#include "network/network_change.h"
+#include "network/network_state.h"
 #include "support/fault_state.h"
 #include "support/network_scene.h"
 #include "support/rounds.h"
@@ -16,18 +17,15 @@
 #include <cstring>
 #include <filesystem>
 #include <functional>
-#include <iterator>
 #include <optional>
-#include <ostream>
-#include <sstream>
 
 #include <sys/mount.h>
-#include <sys/utsname.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
 using test::Card;
-using test::kIfcfg;
+using test::NetworkChange;
+using test::NetworkState;
 using test::Node;
 using test::ReadFile;
 using test::ShellStatus;
@@ -36,72 +34,6 @@ using test::WriteFile;
 namespace {
 
 constexpr const char *kRecord = "/etc/network.undo";
-constexpr const char *kScripts = "/etc/sysconfig/network-scripts";
-
-std::string Text(const char *path)
-{
-    return std::filesystem::exists(path) ? ReadFile(path) : "none";
-}
-
-// Without the temporary ones that a death leaves: a dot and six characters at the end.
-std::string InterfaceFiles()
-{
-    std::vector<std::string> files;
-    for (const auto &entry : std::filesystem::directory_iterator(kScripts)) {
-        if (entry.path().extension().string().size() != 7)
-            files.push_back(entry.path().string() + "\n" + ReadFile(entry.path()));
-    }
-    std::sort(files.begin(), files.end());
-    std::string text;
-    for (const std::string &file : files)
-        text += file;
-    return text;
-}
-
-std::vector<std::string> Fields(const std::string &line)
-{
-    std::istringstream words(line);
-    return {std::istream_iterator<std::string>(words), {}};
-}
-
-// Addresses and routes, without those that the kernel makes by itself.
-std::string IPv6State()
-{
-    std::string state = Text("/proc/sys/net/ipv6/conf/eth0/disable_ipv6");
-    const auto add = [&](const char *table, size_t fields, auto is_ours) {
-        std::istringstream lines(Text(table));
-        for (std::string line; std::getline(lines, line);) {
-            const auto field = Fields(line);
-            if (field.size() == fields && field.back() == "eth0" && !line.starts_with("f") && is_ours(field))
-                state += field[0] + "/" + field[fields == 6 ? 2 : 1] + " " + field[fields == 6 ? 3 : 4] + "\n";
-        }
-    };
-    add("/proc/net/if_inet6", 6, [](const auto &) { return true; });
-    add("/proc/net/ipv6_route", 10, [](const auto &field) {
-        return (std::stoul(field[8], nullptr, 16) & 0x80100000) == 0;  // local, anycast
-    });
-    return state;
-}
-
-// All that a change may leave half done.
-std::string State()
-{
-    std::string state = InterfaceFiles() + IPv6State();
-    for (const char *path : {"/etc/sysconfig/network", "/etc/hosts", "/etc/resolv.conf", "/proc/net/route",
-                             "/sys/class/net/eth0/mtu", "/etc/tavoinfo.conf"})
-        state += std::string(path) + "\n" + Text(path);
-    utsname name;
-    ::uname(&name);
-    TAVONETCARD card = {};
-    TAVONetGetCard1(&card);
-    return state + name.nodename + "\n" + card.szInterface + " " + card.szIp + "/" + card.szMask;
-}
-
-bool HasDefaultRoute()
-{
-    const std::string routes = Text("/proc/net/route");
-    return routes.find("\neth0\t00000000\t") != routes.npos || routes.find("\nbond0\t00000000\t") != routes.npos;
-}
 
 // What changes something outside of the process, or starts a program.
 bool Matters(const test::SystemCall &call)
@@ -126,13 +58,6 @@ fi
 exec /tmp/sh "$@"
 )";
 
-// Gets a lease at once and goes to the background.
-constexpr const char *kClient = R"(#!/bin/sh
-busybox ifconfig "$2" 192.0.2.40 netmask 255.255.255.0
-busybox route add default gw 192.0.2.98
-printf 'IPADDR=192.0.2.40\nNETMASK=255.255.255.0\nGATEWAY=192.0.2.98\n' >/etc/dhcpc/dhcpcd-"$2".info
-)";
-
 // A kernel without bonds: a bridge carries the members' packets as well. The start script runs this first.
 constexpr const char *kBondHook = R"(#!/bin/sh
 scripts=/etc/sysconfig/network-scripts
@@ -149,158 +74,6 @@ esac
 exit 0
 )";
 
-int SetAddress(const char *address)
-{
-    const TAVONETCARD card = Card(TAVO_NET_STATIC, address, "255.255.255.0");
-    return TAVONetSetCard1(&card, &card);
-}
-
-int SetDhcp()
-{
-    const TAVONETCARD card = Card(TAVO_NET_DHCP);
-    return TAVONetSetCard1(&card, &card);
-}
-
-void BackToStatic()
-{
-    ShellStatus("busybox ifconfig eth0 0.0.0.0");
-    WriteFile(kIfcfg, "DEVICE=eth0\nONBOOT=yes\nBOOTPROTO=static\nIPADDR=192.0.2.20\nNETMASK=255.255.255.0\n"
-                      "BROADCAST=192.0.2.255\nNETWORK=192.0.2.0\n");
-    EXPECT_EQ(SetAddress("192.0.2.20"), 0);
-}
-
-int SetServer(const char *server)
-{
-    return TAVONetDNSSet(test::MakeList({server}).get());
-}
-
-bool Shows(const char *command)
-{
-    return ShellStatus(command) == 0;
-}
-
-bool HasIPv6Address()
-{
-    return Shows("grep -q ^20010db8 /proc/net/if_inet6");
-}
-
-bool HasIPv6Route()
-{
-    return Shows("grep -q ^20010db800010000 /proc/net/ipv6_route");
-}
-
-int AddIPv6Address()
-{
-    return TAVONetIPv6AddrAdd("eth0", "2001:db8::20", 64);
-}
-
-int RemoveIPv6Address()
-{
-    return TAVONetIPv6AddrDel("eth0", "2001:db8::20", 64);
-}
-
-int AddIPv6Route()
-{
-    return TAVONetIPv6RouteAdd("eth0", "2001:db8:1::", 48, "2001:db8::1");
-}
-
-int RemoveIPv6Route()
-{
-    return TAVONetIPv6RouteDel("eth0", "2001:db8:1::", 48, "2001:db8::1");
-}
-
-void EnsureIPv6()
-{
-    EXPECT_EQ(TAVONetIPv6Set("eth0", 1), 0);
-    if (!HasIPv6Address()) {
-        EXPECT_EQ(AddIPv6Address(), 0);
-    }
-    if (!HasIPv6Route()) {
-        EXPECT_EQ(AddIPv6Route(), 0);
-    }
-}
-
-int MakeBond()
-{
-    TAVONETLINKAGGR bond = {};
-    std::strcpy(bond.szBond, "bond0");
-    bond.nMode = TAVO_NET_AGGR_BACKUP;
-    bond.nMember = 2;
-    std::strcpy(bond.rgszMember[0], "eth0");
-    std::strcpy(bond.rgszMember[1], "eth1");
-    return TAVONetLinkAggrSet(&bond);
-}
-
-void NoBond()
-{
-    EXPECT_EQ(ShellStatus("/etc/rc.network stop && cd /etc/sysconfig/network-scripts && rm -f * && "
-                          "printf 'DEVICE=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.20\nNETMASK=255.255.255.0\n' "
-                          ">ifcfg-eth0 && printf '# second\nDEVICE=eth1\nBOOTPROTO=none\n' >ifcfg-eth1 && "
-                          "/etc/rc.network start"),
-              0);
-}
-
-struct Change {
-    const char *name;
-    int (*make)();
-    void (*back)();  // from before the change or from after it
-    int stride = 1;  // of a short run
-    enum { nothing, ipv6, client } needs = nothing;
-    int first_command = 1;  // of those whose failure counts
-};
-
-void PrintTo(const Change &change, std::ostream *out)
-{
-    *out << change.name;
-}
-
-const Change kChanges[] = {
-    {"Address", [] { return SetAddress("192.0.2.60"); },
-     [] {
-         EXPECT_EQ(SetAddress("192.0.2.20"), 0);
-     }},
-    {"ToDhcp", SetDhcp, BackToStatic, 3, Change::client},
-    {"FromDhcp", [] { return SetAddress("192.0.2.20"); }, [] { EXPECT_EQ(SetDhcp(), 0); }, 3, Change::client},
-    {"Gateway", [] { return TAVONetDefaultGatewaySet("192.0.2.30"); },
-     [] {
-         EXPECT_EQ(TAVONetDefaultGatewaySet("192.0.2.99"), 0);
-     }},
-    {"Name", [] { return TAVOLnxSetHostname("attic"); },
-     [] {
-         EXPECT_EQ(TAVOLnxSetHostname("here"), 0);
-     }},
-    {"Mtu", [] { return TAVONetSetMTUValue("eth0", 1400); },
-     [] {
-         EXPECT_EQ(TAVONetSetMTUValue("eth0", 1500), 0);
-     }},
-    {"Servers", [] { return SetServer("192.0.2.54"); },
-     [] {
-         EXPECT_EQ(SetServer("192.0.2.53"), 0);
-     }},
-    {"Route", [] { return TAVONetRouteAdd("198.51.100.0", "255.255.255.0", "eth0"); },
-     [] {
-         ShellStatus("busybox route del -net 198.51.100.0 netmask 255.255.255.0 dev eth0 2>/dev/null");
-     }},
-    {"Bond", MakeBond, NoBond, 12, Change::nothing, 2},
-    {"IPv6Address", AddIPv6Address,
-     [] {
-         EXPECT_TRUE(HasIPv6Address() || AddIPv6Address() == 0);
-         EXPECT_EQ(RemoveIPv6Address(), 0);
-     },
-     2, Change::ipv6},
-    {"IPv6AddressGone", RemoveIPv6Address, EnsureIPv6, 2, Change::ipv6},
-    {"IPv6Route", AddIPv6Route,
-     [] {
-         EnsureIPv6();
-         EXPECT_EQ(RemoveIPv6Route(), 0);
-     },
-     2, Change::ipv6},
-    {"IPv6RouteGone", RemoveIPv6Route, EnsureIPv6, 2, Change::ipv6},
-    {"IPv6Off", [] { return TAVONetIPv6Set("eth0", 0); }, EnsureIPv6, 2, Change::ipv6},
-    {"IPv6On", [] { return TAVONetIPv6Set("eth0", 1); }, [] { EXPECT_EQ(TAVONetIPv6Set("eth0", 0), 0); }, 2,
-     Change::ipv6},
-};
-
 class Death : public test::NetworkScene {
   protected:
     void SetUp() override
@@ -313,15 +86,15 @@ class Death : public test::NetworkScene {
         cable_->Plug(*here_, "eth1");
         EXPECT_TRUE(here_->Run([] {
             std::filesystem::create_directories("/etc/dhcpc");
-            EXPECT_EQ(SetAddress("192.0.2.20"), 0);
-            EXPECT_EQ(SetServer("192.0.2.53"), 0);
+            EXPECT_EQ(test::SetAddress("192.0.2.20"), 0);
+            EXPECT_EQ(test::SetServer("192.0.2.53"), 0);
             EXPECT_EQ(TAVONetSetMTUValue("eth0", 1500), 0);
             return true;
         }));
     }
 };
 
-class AnyChange : public Death, public testing::WithParamInterface<Change> {
+class AnyChange : public Death, public testing::WithParamInterface<NetworkChange> {
   protected:
     void SetUp() override
     {
@@ -330,7 +103,7 @@ class AnyChange : public Death, public testing::WithParamInterface<Change> {
             return;
         if (test::TakesLong() && !std::getenv("TAVO_LONG_TESTS") && GetParam().stride == 2)
             GTEST_SKIP() << "the other changes are enough here, where all takes long";
-        if (GetParam().needs == Change::ipv6 && !std::filesystem::exists("/proc/net/if_inet6"))
+        if (GetParam().needs == NetworkChange::ipv6 && !std::filesystem::exists("/proc/net/if_inet6"))
             GTEST_SKIP() << "the kernel has no IPv6";
         WriteFile("/var/standin/rc.network.hook", kBondHook, 0755);
     }
@@ -339,20 +112,21 @@ class AnyChange : public Death, public testing::WithParamInterface<Change> {
     void Try(const std::function<void(const std::string &before, const std::string &asked)> &body)
     {
         std::optional<test::ScriptedClient> client;
-        if (GetParam().needs == Change::client)
-            client.emplace(kClient);
+        if (GetParam().needs == NetworkChange::client)
+            client.emplace(test::kQuickClient);
         EXPECT_TRUE(here_->Run([&] {
-            if (GetParam().needs == Change::ipv6)
-                EnsureIPv6();
+            if (GetParam().needs == NetworkChange::ipv6)
+                test::EnsureIPv6();
             GetParam().back();
-            const std::string before = State();
-            EXPECT_TRUE(HasDefaultRoute());
+            const std::string before = NetworkState();
+            EXPECT_TRUE(test::HasDefaultRoute());
             EXPECT_EQ(GetParam().make(), 0);
-            const std::string asked = State();
+            const std::string asked = NetworkState();
             EXPECT_NE(asked, before);
-            EXPECT_TRUE(HasDefaultRoute());
+            EXPECT_TRUE(test::HasDefaultRoute());
+            EXPECT_NE(test::OwnAddress(), "127.0.1.1") << "there is a card with an address";
             GetParam().back();
-            EXPECT_EQ(State(), before);
+            EXPECT_EQ(NetworkState(), before);
             if (!HasFailure())
                 body(before, asked);
             return true;
@@ -375,9 +149,10 @@ class AnyChange : public Death, public testing::WithParamInterface<Change> {
     static void Judge(int status, const std::string &before, const std::string &asked, const std::string &place)
     {
         EXPECT_LE(status, 2) << place;
-        EXPECT_TRUE(HasDefaultRoute()) << place;
+        EXPECT_TRUE(test::HasDefaultRoute()) << place;
         EXPECT_EQ(TAVONetHostsRefresh(), 0);
-        const std::string found = State();
+        EXPECT_NE(test::OwnAddress(), "none") << place;
+        const std::string found = NetworkState();
         EXPECT_TRUE(status == 2 || found == asked || (status != 0 && found == before))
             << place << " status " << status << "\n"
             << found << "\nbefore:\n"
@@ -386,7 +161,7 @@ class AnyChange : public Death, public testing::WithParamInterface<Change> {
         EXPECT_FALSE(std::filesystem::exists(kRecord)) << place;
         if (found != before)
             GetParam().back();
-        EXPECT_EQ(State(), before) << place;
+        EXPECT_EQ(NetworkState(), before) << place;
     }
 };
 
@@ -402,7 +177,7 @@ TEST_P(AnyChange, DiesAnywhere)
             if (!test::DiesAtCall(calls[i].index, Make))
                 break;
             EXPECT_EQ(TAVONetHostsRefresh(), 0);
-            as_before += State() == before;
+            as_before += NetworkState() == before;
             Judge(-1, before, asked, "death at call " + std::to_string(calls[i].index) + ", " + calls[i].Name());
             if (HasFailure())
                 return;
@@ -476,12 +251,12 @@ TEST_P(AnyChange, FailsAtAnyCommand)
     });
 }
 
-std::string NameOf(const testing::TestParamInfo<Change> &change)
+std::string NameOf(const testing::TestParamInfo<NetworkChange> &change)
 {
     return change.param.name;
 }
 
-INSTANTIATE_TEST_SUITE_P(Of, AnyChange, testing::ValuesIn(kChanges), NameOf);
+INSTANTIATE_TEST_SUITE_P(Of, AnyChange, testing::ValuesIn(test::kNetworkChanges), NameOf);
 
 // To DHCP and back, whatever the server does: the box can always be reached from beyond its router.
 TEST_F(Death, IsNotWhatALeaseCosts)
@@ -507,24 +282,27 @@ printf 'IPADDR=192.0.2.40\nNETMASK=255.255.255.0\nGATEWAY=%s\n' $router >/etc/dh
         const std::string server = servers[round % 4];
         // A client gives up after 30 s; most rounds have not the time.
         const int patience = !is_long ? 0 : round % 28 == 1 ? 30 : 2;
+        const bool works = server.starts_with("there");
         EXPECT_TRUE(here_->Run([&] {
             WriteFile("/tmp/server", server + (server == "absent" ? " - " : " ") + std::to_string(patience) + "\n");
-            const TAVONETCARD lease = Card(TAVO_NET_DHCP);
-            const TAVONETCARD fixed = Card(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0");
-            const bool works = server.starts_with("there");
-            for (const TAVONETCARD *card : {&lease, &fixed}) {
-                EXPECT_EQ(TAVONetSetCard1(card, nullptr), card == &fixed || works ? 0 : -1) << server;
-                const std::string gateway = card == &lease && works ? server.substr(6) : "192.0.2.99";
+            return true;
+        }));
+        for (const bool leased : {true, false}) {
+            const std::string address = leased && works ? "192.0.2.40" : "192.0.2.20";
+            EXPECT_TRUE(here_->Run([&] {
+                const TAVONETCARD card =
+                    leased ? Card(TAVO_NET_DHCP) : Card(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0");
+                EXPECT_EQ(TAVONetSetCard1(&card, nullptr), !leased || works ? 0 : -1);
                 char live[20] = "";
                 EXPECT_EQ(TAVONetDefaultGatewayGet(live, sizeof live), 0);
-                EXPECT_EQ(live, gateway) << server;
-                EXPECT_EQ(ShellStatus("busybox ping -c 1 -w 5 198.51.100.1 >/dev/null"), 0) << server;
-                EXPECT_THAT(Text("/etc/hosts"),
-                            testing::HasSubstr(card == &lease && works ? "192.0.2.40\there\n" : "192.0.2.20\there\n"));
-            }
-            return true;
-        })) << "round "
-            << round << ", " << server;
+                EXPECT_EQ(live, leased && works ? server.substr(6) : "192.0.2.99");
+                EXPECT_THAT(test::TextOrNone("/etc/hosts"), testing::HasSubstr(address + "\there\n"));
+                return true;
+            })) << "round "
+                << round << ", " << server;
+            EXPECT_EQ(router.Shell("busybox ping -c 1 -w 5 -I 198.51.100.1 " + address + " >/dev/null"), 0)
+                << "round " << round << ", " << server << ": a manager beyond the router is locked out";
+        }
     }
 }
 

@@ -1,10 +1,9 @@
 // Bonds of the machine's two cards: made in each mode, cut off from a cable, dissolved, and interrupted at any moment.
 #include "tavo_net.h"
 
+#include "machine_network.h"
 #include "support/eventually.h"
-#include "support/machine.h"
 #include "support/rounds.h"
-#include "support/scratch_dir.h"
 
 #include <gmock/gmock.h>
 
@@ -20,6 +19,7 @@
 
 using test::Eventually;
 using test::Happen;
+using test::kScripts;
 using test::ReadFile;
 using test::Told;
 using test::WriteFile;
@@ -27,7 +27,6 @@ using testing::HasSubstr;
 
 namespace {
 
-const std::string kScripts = "/etc/sysconfig/network-scripts/";
 constexpr const char *kCalls = "/var/standin/rc.log";
 
 constexpr const char *kEth0 = "DEVICE=eth0\nONBOOT=yes\nBOOTPROTO=static\nIPADDR=192.0.2.10\nNETMASK=255.255.255.0\n";
@@ -63,28 +62,16 @@ int Set(int mode, const std::vector<const char *> &members = {})
 
 const std::vector<const char *> kBoth = {"eth0", "eth1"};
 
-class MachineBond : public test::MachineTest {
+class MachineBond : public test::MachineNetwork {
   protected:
     void SetUp() override
     {
-        MachineTest::SetUp();
+        MachineNetwork::SetUp();
         if (IsSkipped())
             return;
-        std::filesystem::create_directories(kScripts);
-        for (const auto &entry : std::filesystem::directory_iterator(kScripts))
-            std::filesystem::remove(entry);
-        WriteFile(kScripts + "ifcfg-eth0", kEth0);
-        WriteFile(kScripts + "ifcfg-eth1", kEth1);
-        WriteFile("/etc/sysconfig/network", "HOSTNAME=appliance\n");
-        Told("/etc/rc.network start");
+        Start(kEth0, kEth1, "HOSTNAME=appliance\n");
         ASSERT_TRUE(HasAddress("eth0", "192.0.2.10"));
         ASSERT_TRUE(HasAddress("eth1", "198.51.100.10"));
-    }
-
-    void TearDown() override
-    {
-        if (test::OnMachine())
-            Told("/etc/rc.network stop; killall findhostd 2>/dev/null; /usr/lib/tavo-machine/reset");
     }
 
     static std::map<std::string, std::string> Files()
@@ -228,6 +215,32 @@ TEST_F(MachineBond, ADeathAtAnyMomentLeavesANetworkThatStarts)
     ASSERT_EQ(Set(TAVO_NET_AGGR_NONE), 0) << std::hex << TLIBErrGet();
     EXPECT_EQ(ReadFile(kScripts + "ifcfg-eth0"), kEth0);
     EXPECT_EQ(ReadFile(kScripts + "ifcfg-eth1"), kEth1);
+}
+
+// A document becomes the network, and a boot, which finds nothing of it in the kernel, makes the same one of the files.
+TEST_F(MachineBond, ABootAfterApplyHasTheSameNetwork)
+{
+    WriteFile("/tmp/net.json",
+              R"({"format_version": 1, "hostname": "attic", "gateway": "192.0.2.1", "dns": ["192.0.2.53"],
+        "search": ["example.com"], "cards": [
+        {"name": "bond0", "bond": "backup", "members": ["eth0", "eth1"], "address": "192.0.2.10/24",
+         "more_addresses": ["203.0.113.1/29"], "routes": ["233.252.0.0/24 via 192.0.2.4"], "mtu": 1450}]})");
+    Told("tavoctl net apply --no-probe /tmp/net.json");
+    const std::string exported = Told("tavoctl net export");
+    const std::string routes = Told("ip -4 route | sort");
+    EXPECT_THAT(routes, HasSubstr("default via 192.0.2.1 dev bond0"));
+    EXPECT_THAT(routes, HasSubstr("233.252.0.0/24 via 192.0.2.4 dev bond0"));
+
+    Told("/etc/rc.network stop; killall findhostd; for card in eth0 eth1; do ip addr flush dev $card; "
+         "ip link set $card down mtu 1500; done; modprobe -r bonding 2>/dev/null; modprobe bonding max_bonds=0 "
+         "2>/dev/null; "
+         "rm -rf /tmp/lock/*; [ ! -e /sys/class/net/bond0 ]");
+    Told("/etc/rc.network start");
+    EXPECT_TRUE(Eventually([] { return BlTLIBIsConnected("bond0") == 1; }));
+    EXPECT_EQ(Told("tavoctl net export"), exported);
+    EXPECT_EQ(Told("ip -4 route | sort"), routes);
+    EXPECT_THAT(Told("getent hosts $(hostname)"), HasSubstr("192.0.2.10"));
+    EXPECT_THAT(Told("tavoctl net apply --no-probe --json /tmp/net.json"), HasSubstr("\"changed\": false"));
 }
 
 }  // namespace
