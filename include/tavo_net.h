@@ -116,7 +116,7 @@ TAVO_API int TAVONetGetCard(const char *szInterface, TAVONETCARD *pCard);
 /* Sets the address of the interface pCard->szInterface. With DHCP a running client is killed, then a new one has 30 s
  * to get a lease; with a static address szIp and szMask are applied and stored. pPrevious is the previous record (NULL
  * when there is none): when the address differs, the dynamic-DNS daemon is notified. Then missing routes are added: the
- * connected networks and the default route. The stored gateway belongs to a static address of the first card. With DHCP
+ * connected networks and the default route. Further addresses stay (/sbin/ip). The stored gateway belongs to a static address of the first card. With DHCP
  * the gateway of the lease is used; the stored one only when the lease names none and there is no default route.
  * Returns 0; -2 when the interface has its address but its file could not be written; or -1 with the old address and
  * routes in force (a DHCP client that ran is started again, without waiting for it) and
@@ -126,7 +126,7 @@ TAVO_API int TAVONetGetCard(const char *szInterface, TAVONETCARD *pCard);
  *   ERR_OP_FAILURE       a command failed, or the old client cannot be killed (30 attempts, one a second)
  * Files: /etc/sysconfig/network-scripts, /etc/sysconfig/network, /etc/hosts, /etc/resolv.conf,
  *   /etc/ppp/old_gateway.bak, /var/run/ddnsd.pid, /etc/network.undo
- * Runs: /sbin/ifconfig, /sbin/route, /sbin/dhcpcd
+ * Runs: /sbin/ifconfig, /sbin/route, /sbin/dhcpcd, /sbin/ip
  * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */
 TAVO_API int TAVONetSetCard1(const TAVONETCARD *pCard, const TAVONETCARD *pPrevious);
 

@@ -44,8 +44,8 @@ int Store(const char *interface, const std::string &options)
                : ERR_SUCCESS;
 }
 
-// Whether the card has to be told; empty when it does not answer or cannot do it.
-std::optional<bool> IsToBeTold(const char *interface, uint32_t bits)
+// Whether the setting of the card differs; empty when the card does not answer or cannot do it.
+std::optional<bool> HasToChange(const char *interface, uint32_t bits)
 {
     const auto wake = tavo::GetWakeSettings(interface);
     if (!wake) {
@@ -69,13 +69,13 @@ int TellCard(const char *interface, uint32_t bits)
     return ERR_OP_FAILURE;
 }
 
-// Stored first: nobody takes back what the panel was told.
+// Stored first: the panel cannot be switched off again.
 int Set(const char *interface, bool on, const std::string &options, uint32_t bits)
 {
     const bool by_panel = tavo::IsWokenByPanel();
     if (by_panel && !on)
         return Fail(ERR_OP_UNREGISTERED);  // the controller knows no word for it
-    const auto tells = by_panel ? std::optional(true) : IsToBeTold(interface, bits);
+    const auto tells = by_panel ? std::optional(true) : HasToChange(interface, bits);
     if (!tells)
         return Fail(ERR_OP_FAILURE);
     tavo::Checkpoint before;

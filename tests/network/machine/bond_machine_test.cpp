@@ -234,7 +234,7 @@ TEST_F(MachineBond, ABootAfterApplyHasTheSameNetwork)
     Told("/etc/rc.network stop; killall findhostd; for card in eth0 eth1; do ip addr flush dev $card; "
          "ip link set $card down mtu 1500; done; modprobe -r bonding 2>/dev/null; modprobe bonding max_bonds=0 "
          "2>/dev/null; "
-         "rm -rf /tmp/lock/*; [ ! -e /sys/class/net/bond0 ]");
+         "rm -rf /tmp/lock; mkdir /tmp/lock; [ ! -e /sys/class/net/bond0 ]");
     Told("/etc/rc.network start");
     EXPECT_TRUE(Eventually([] { return BlTLIBIsConnected("bond0") == 1; }));
     EXPECT_EQ(Told("tavoctl net export"), exported);

@@ -1,4 +1,4 @@
-// Wake-on-LAN of a real card: told, applied, put back and kept by the start script.
+// Wake-on-LAN of a real card: applied, put back and kept by the start script.
 #include "tavo_net.h"
 
 #include "machine_network.h"

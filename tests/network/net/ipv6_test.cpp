@@ -195,7 +195,7 @@ TEST_F(NetIPv6, SetsTheWakeUpPacketsOfACard)
     EXPECT_THAT(log_.Texts(), IsEmpty());
 }
 
-// Stored and told, or neither; also when it is a part of a larger change.
+// Stored and set, or neither; also as a part of a larger change.
 TEST_F(NetIPv6, WakeOnLanIsPutBack)
 {
     const std::string before = ReadFile(kTavoinfo);

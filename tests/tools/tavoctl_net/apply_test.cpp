@@ -224,7 +224,7 @@ TEST_F(NetApply, ALeaseAppliedTwiceChangesNothingTheSecondTime)
 }
 
 // The panel of this model wakes it. It knows no word for the way back: then the document is not applied at all.
-TEST_F(NetApply, AWakingCardAppliedTwiceIsToldOnce)
+TEST_F(NetApply, AWakingCardAppliedTwiceIsSetOnce)
 {
     EXPECT_TRUE(here_->Run([&] {
         WriteFile("/etc/tavoinfo.conf", "support_wol=\"yes\"\nwol_enabled_options=\"g\"\n");
