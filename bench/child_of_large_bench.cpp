@@ -1,4 +1,4 @@
-// Running a program from a parent of one gibibyte: what it costs must not grow with the parent.
+// Running a program from a parent of one gibibyte: the cost must not grow with the parent.
 #include "children.h"
 
 #include <cstdio>

@@ -20,8 +20,8 @@ struct Contender {
     std::function<uint64_t()> work;  // returns a number that depends on its result
 };
 
-// What a piece of work is measured by: the time that passes, or the time of this processor alone, which other load on
-// the machine disturbs less. The second is for work that neither waits nor starts children.
+// The measure of a benchmark: wall-clock time, or CPU time, which other load on the machine disturbs less. CPU time is
+// for work that neither waits nor starts children.
 enum class Clock { kElapsed, kProcessor };
 
 // Ends the program when the contenders do not all give the same number. The first is what the others are compared to.

@@ -45,7 +45,7 @@ endfunction()
 function(tavo_precompile target)
     if(TAVO_PRECOMPILE)
         target_precompile_headers(${target} PRIVATE ${ARGN})
-        # From there g++ 12 warns of overruns inside std::string that are none.
+        # From there g++ 12 warns wrongly of overruns inside std::string.
         target_compile_options(${target} PRIVATE
             "$<$<COMPILE_LANG_AND_ID:CXX,GNU>:-Wno-array-bounds;-Wno-restrict;-Wno-stringop-overflow;-Wno-stringop-overread>")
     endif()

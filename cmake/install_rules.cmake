@@ -1,4 +1,4 @@
-# What an installation holds, in components that a packager can take one by one:
+# The contents of an installation, in components that a packager can take one by one:
 #   runtime      the library, the small one that it loads itself, and what keeps /tmp's cleaner away from its lock files
 #   development  headers, and what pkg-config and find_package need
 #   tavoctl      the command-line program with its man page and completion

@@ -1,4 +1,4 @@
-// What a fuzz target was given, taken piece by piece; past its end everything is 0 or empty.
+// The input of a fuzz target, taken piece by piece; past its end everything is 0 or empty.
 #ifndef FUZZ_INPUT_H
 #define FUZZ_INPUT_H
 

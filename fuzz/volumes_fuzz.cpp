@@ -1,5 +1,5 @@
-// What the kernel says of mounts and processes: a volume is what is mounted at /volumeN and nothing else, and a process
-// has the name of its program.
+// The kernel's texts about mounts and processes: only a mount at /volumeN is a volume, and a process has the name of
+// its program.
 #include "input.h"
 
 #include "service/detail/process_named.h"

@@ -14,7 +14,7 @@ namespace {
 
 constexpr const char *kList = "/tmp/tavods.list";
 
-// Somebody's folder in the list's place cannot be replaced by a file; it goes out of the way.
+// A foreign folder at the list's path cannot be replaced by a file, so it is renamed.
 bool MoveFolderAside()
 {
     char aside[] = "/tmp/.tavods.aside.XXXXXX";
@@ -45,7 +45,7 @@ bool WriteAll(int fd, std::string_view text)
 
 bool WriteList(std::string_view text)
 {
-    // A file of our own, made where nothing was; the rename takes away a link, or another's file, without following it.
+    // A new file of our own; the rename replaces a link or a foreign file without following it.
     char temp[] = "/tmp/.tavods.list.XXXXXX";
     const int fd = ::mkostemp(temp, O_CLOEXEC);
     if (fd < 0)

@@ -44,7 +44,7 @@ uint32_t ModelNumber()
     return model ? model : 1;
 }
 
-// A caller may have closed its standard streams: what is opened later must not be taken for one.
+// A caller may have closed its standard streams: files opened later must not become one of them.
 void HaveStandardStreams()
 {
     int fd;
@@ -55,7 +55,7 @@ void HaveStandardStreams()
         ::close(fd);
 }
 
-// The pid file, locked for as long as the daemon lives; -1 with errno, EWOULDBLOCK when somebody else has it.
+// The pid file, locked while the daemon runs; -1 with errno, EWOULDBLOCK when another process holds it.
 int OpenPidFile()
 {
     const int fd = ::open(kPidFile, O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK, 0644);

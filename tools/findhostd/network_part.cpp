@@ -19,7 +19,7 @@
 namespace findhostd {
 namespace {
 
-constexpr int64_t kCollect = 15000;  // ms after a query of ours; what comes later, or unasked, is not listed
+constexpr int64_t kCollect = 15000;  // ms after a query of ours; later or unasked replies are not listed
 
 struct Packet {
     std::array<uint8_t, kLargestPacket + 1> bytes;  // one more than any packet of ours has: too large is seen
@@ -129,7 +129,7 @@ class Listener {
 
     void Answer(const Packet &packet)
     {
-        // An asker from elsewhere may be a forged address, whom we would flood on somebody's behalf.
+        // An address outside the network may be forged, and its host would be flooded with our answers.
         const in_addr *const own = addresses_.Near(packet.interface, packet.from);
         if (!own || !budget_.Take(packet.from, Now()))
             return;
@@ -143,7 +143,7 @@ class Listener {
         Send(network_, {bytes.data(), size}, packet.from, packet.interface, *own);
     }
 
-    // What the other part has no room for is lost: it is asked again soon.
+    // A report for which the other part has no room is lost; the next query brings it again.
     void Tell(const Report &report) { ::send(reports_, &report, sizeof report, MSG_DONTWAIT | MSG_NOSIGNAL); }
 
     int network_;

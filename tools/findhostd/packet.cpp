@@ -1,4 +1,4 @@
-// The discovery packets: what is asked on the network and what is answered.
+// The discovery packets: queries and replies.
 #include "packet.h"
 
 #include "tavo_fhost.h"

@@ -1,4 +1,4 @@
-// The discovery packets: what is asked on the network and what is answered. docs/discovery.md has the bytes.
+// The discovery packets: queries and replies. docs/discovery.md describes the bytes.
 #ifndef FINDHOSTD_PACKET_H
 #define FINDHOSTD_PACKET_H
 
@@ -17,7 +17,7 @@ inline constexpr size_t kLargestPacket = 512;
 inline constexpr size_t kLongestName = 63;
 inline constexpr uint32_t kProtocol = 240;  // ours, and the least that a list has room for
 
-// An appliance as it describes itself. No pointers: it goes over a socket as it is.
+// An appliance as it describes itself. No pointers, because it is sent over a socket byte by byte.
 struct Host {
     uint32_t model;
     uint32_t protocol;
@@ -29,12 +29,12 @@ struct Host {
 // characters, marks of direction, line separators, commas and parentheses, and without a blank at either end.
 bool IsHostName(std::string_view name) noexcept;
 
-// What can stand in the list: a model, a protocol of 240 or more, a name, an address that a host can have.
+// Checks that a host can be listed: a model, a protocol of 240 or more, a name, an address that a host can have.
 bool IsSound(const Host &host) noexcept;
 
 enum class PacketKind { other, query, reply };
 
-// What the packet is. Of a reply, `host` is filled in, and sound; else it is left alone.
+// Returns the kind of the packet. For a reply, fills in `host`, checked; otherwise leaves it alone.
 PacketKind ReadPacket(std::span<const uint8_t> packet, Host &host) noexcept;
 
 // The reply of a sound host; returns its size.

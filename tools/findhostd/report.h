@@ -1,5 +1,5 @@
-// What the part that listens to the network tells the part that writes the list. Each is one message of a socket that
-// keeps them apart.
+// The reports of the part that listens to the network to the part that writes the list. Each is one message of a packet
+// socket.
 #ifndef FINDHOSTD_REPORT_H
 #define FINDHOSTD_REPORT_H
 

@@ -22,7 +22,7 @@ namespace {
 
 enum class Heard { nothing, change, no_change, end };
 
-// One report. The other part may have been taken over by somebody from the network: nothing of it is believed unseen.
+// Handles one report. An attacker may control the other part, so every field is checked.
 Heard HearOne(int reports, HostTable &table, OwnAddresses &addresses)
 {
     Report report{};

@@ -9,7 +9,7 @@
 
 namespace sfdisk {
 
-// What went wrong, in words for an administrator; the program ends with it.
+// The failure, in words for an administrator; the program ends with it.
 class Failure : public std::runtime_error {
   public:
     using std::runtime_error::runtime_error;
@@ -39,7 +39,7 @@ class BlockTarget {
     // In one write, and on the disk when it returns.
     void Write(uint64_t number, const Sector &sector);
 
-    // What was written through the descriptor is on the disk when it returns.
+    // Syncs all writes through the descriptor to the disk.
     void Sync();
 
     // Makes the kernel read the table again. It refuses that while partitions of the disk are in use; then it is

@@ -1,4 +1,4 @@
-// What the program does: list, create, empty one entry, write an empty table.
+// The commands of the program: list, create, empty one entry, write an empty table.
 #include "commands.h"
 
 #include "guid_table.h"
@@ -186,7 +186,7 @@ int RunLabel(const Options &options)
         disk.Sync();
     } else {
         EraseGuidHeaders(disk);
-        // All of the sector: what is left of a file system's first sector would make the disk look like one.
+        // The whole sector: the rest of a file system's first sector would make the disk look like one.
         Sector sector = {};
         SetSignature(sector);
         disk.Write(0, sector);

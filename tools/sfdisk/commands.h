@@ -1,4 +1,4 @@
-// What the program does.
+// The commands of the program.
 #ifndef SFDISK_COMMANDS_H
 #define SFDISK_COMMANDS_H
 

@@ -40,7 +40,7 @@ bool ParseNumber(std::string_view text, Number &number, int base = 10)
     return error == std::errc{} && end == text.data() + text.size();
 }
 
-// What was given, before it is judged as a whole.
+// The given options, before their combination is checked.
 struct Given {
     Options options;
     bool list = false;

@@ -12,8 +12,8 @@ constexpr int kLastLogical = 255;
 constexpr size_t kLongestChain = 1024;  // an emptied link stays in the chain
 
 // A chain starts in the first sector of the extended partition. Each of its sectors holds a logical partition, counted
-// from that very sector, and a link to the next, counted from the start of the extended partition. What is broken ends
-// the chain, as it does for the kernel.
+// from that very sector, and a link to the next, counted from the start of the extended partition. A broken link ends
+// the chain, as in the kernel.
 void ReadLogical(const BlockTarget &disk, const TableEntry &extended, std::vector<Partition> &partitions)
 {
     const uint64_t end = std::min(disk.Sectors(), extended.End());

@@ -10,7 +10,7 @@
 namespace sfdisk {
 
 inline constexpr size_t kSectorBytes = 512;
-inline constexpr uint64_t kAddressableSectors = uint64_t{1} << 32;  // what 32-bit sector numbers reach
+inline constexpr uint64_t kAddressableSectors = uint64_t{1} << 32;  // the reach of 32-bit sector numbers
 
 using Sector = std::array<uint8_t, kSectorBytes>;
 

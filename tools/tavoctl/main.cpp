@@ -1,4 +1,4 @@
-// tavoctl: what an administrator or a script runs to read and change the state of the appliance.
+// tavoctl: administrators and scripts run it to read and change the state of the appliance.
 #include "frame/program.h"
 #include "frame/terminal.h"
 #include "standard_descriptors.h"

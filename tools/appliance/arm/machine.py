@@ -218,7 +218,7 @@ class Machine:
             '-fsdev', f'local,id=programs,path={programs},security_model=none,readonly=on',
             '-device', 'virtio-9p-pci,fsdev=programs,mount_tag=programs',
             '-device', 'ich9-ahci,id=bus' if hardware.bus == 'sata' else 'virtio-scsi-pci,id=bus']
-        # Both network cards hang on one cable: what one sends the other hears.
+        # Both network cards are on one cable: each receives what the other sends.
         for card in range(2):
             command += ['-netdev', f'hubport,hubid=0,id=cable{card}', '-device',
                         f'virtio-net-pci,id=eth{card},romfile=,speed=1000,duplex=full,netdev=cable{card},'

@@ -77,7 +77,7 @@ std::optional<LinesByKey> ReadStore(const char *path, std::string &reason)
     return store ? store.Entries() : std::nullopt;
 }
 
-// Which fields of the two lines differ. What they hold is not for everybody's eyes.
+// Names the fields in which the two lines differ. Their contents may be secret.
 std::string Difference(const std::string &in_file, const std::string &in_store, const std::vector<std::string> &names)
 {
     const std::vector<std::string> a = SplitFields(in_file);

@@ -20,7 +20,7 @@ struct GivenHashes {
     std::string name, password, lm, nt;
 };
 
-// What a list of users asks for.
+// The changes that a list of users asks for.
 struct UserPlan {
     std::string path;  // of the list
     std::vector<UserChange> changes = {};
@@ -29,8 +29,8 @@ struct UserPlan {
     int additions = 0;
 };
 
-// Looks at every row and notes in the call what differs; throws a Failure for what is refused. `password`: what the options
-// say for a new user whose row has none; nullptr: it is locked, and an empty hash is not a password.
+// Checks every row and records the differences in the call; throws a Failure for a refusal. `password`: the options for
+// a new user whose row has none; nullptr: the user is locked, and an empty hash is not a password.
 UserPlan PlanUsers(Call &call, const std::string &path, bool update, const std::vector<AccountRow> &rows,
                    const PasswordChoice *password);
 void CarryOut(const UserPlan &plan);

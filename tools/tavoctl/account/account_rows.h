@@ -11,7 +11,7 @@ namespace tavoctl {
 
 struct AccountRow {
     int number;                                 // line of the file, or element of the array, from 1
-    std::map<std::string, std::string> fields;  // what the row does not say is not there
+    std::map<std::string, std::string> fields;  // only the fields that the row has
 
     const std::string *Find(const std::string &column) const;
     std::string Where() const;  // "row 3"

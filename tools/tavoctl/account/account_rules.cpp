@@ -1,4 +1,4 @@
-// What tavoctl asks of accounts beyond the library.
+// tavoctl's own rules for accounts, beyond those of the library.
 #include "account/account_rules.h"
 
 #include "account/user_record.h"

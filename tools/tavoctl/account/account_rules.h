@@ -1,4 +1,4 @@
-// What tavoctl asks of accounts beyond the library, and what it warns of.
+// tavoctl's own rules and warnings for accounts, beyond those of the library.
 #ifndef TAVOCTL_ACCOUNT_RULES_H
 #define TAVOCTL_ACCOUNT_RULES_H
 
@@ -13,7 +13,7 @@ std::string SomeOf(const std::vector<std::string> &names);
 // Digits only, blanks, and characters that may look like others.
 void WarnOfName(const std::string &name);
 
-// The user id handed out last, as /etc/tavouser.conf records it; -1 when it does not.
+// The user id assigned last, from /etc/tavouser.conf; -1 when it is not recorded.
 int LastUserId();
 
 // Ids of deleted users come back once all are used up; their files are still theirs.

@@ -1,4 +1,4 @@
-// What on the appliance still uses an account or a group.
+// Finds the uses of an account or a group on the appliance.
 #include "account/account_use.h"
 
 #include "account/account_check.h"
@@ -20,7 +20,7 @@
 namespace tavoctl {
 namespace {
 
-// The terminal of a session; empty without one. A session whose process has ended without a word is none.
+// The terminal of a session; empty without one. A session whose process died does not count.
 std::string SessionOf(const std::string &name)
 {
     std::string terminal;

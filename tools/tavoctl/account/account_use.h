@@ -1,4 +1,4 @@
-// What on the appliance still uses an account or a group.
+// Finds the uses of an account or a group on the appliance.
 #ifndef TAVOCTL_ACCOUNT_USE_H
 #define TAVOCTL_ACCOUNT_USE_H
 

@@ -1,4 +1,4 @@
-// What the verbs of users and of groups share. A Kind says what differs: its record, columns and functions.
+// The shared parts of the verbs of users and of groups. A Kind has the differences: its record, columns and functions.
 #ifndef TAVOCTL_ACCOUNT_VERBS_H
 #define TAVOCTL_ACCOUNT_VERBS_H
 
@@ -77,7 +77,7 @@ Action AccountDelete(Arguments &in)
     };
 }
 
-// What both imports look at in a row of a list, before anything is changed.
+// The checks of both imports for a row of a list, before anything is changed.
 template <class Kind>
 class ImportedRows {
   public:
@@ -88,7 +88,7 @@ class ImportedRows {
         return "import " + path_ + ", " + row.Where() + ", " + *row.Find("name");
     }
 
-    // The account of the row as it is now; nothing for a new one.
+    // The present account of the row; nothing for a new one.
     std::optional<typename Kind::Record> Present(const AccountRow &row)
     {
         const std::string name = *row.Find("name");

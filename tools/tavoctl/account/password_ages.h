@@ -1,4 +1,4 @@
-// How long passwords are valid, and whether Samba lets an account in: what records of users do not have.
+// The validity of passwords, and whether Samba accepts an account: facts that records of users do not have.
 #ifndef TAVOCTL_PASSWORD_AGES_H
 #define TAVOCTL_PASSWORD_AGES_H
 

@@ -1,4 +1,4 @@
-// tavoctl user: what changes single accounts.
+// tavoctl user: the verbs that change single accounts.
 #include "account/account_rules.h"
 #include "account/user_verbs.h"
 #include "frame/failure.h"
@@ -7,7 +7,7 @@
 namespace tavoctl {
 namespace {
 
-// What add and modify can say of an account.
+// The facts of an account that add and modify can set.
 class UserFacts {
   public:
     explicit UserFacts(Arguments &in)

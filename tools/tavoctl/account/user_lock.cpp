@@ -6,7 +6,7 @@
 namespace tavoctl {
 namespace {
 
-// What the account is going to be, by the library's rule: a hash without its "!", or with one.
+// The future state of the account, by the library's rule: a hash without its "!", or with one.
 std::string StateAfter(const User &user, bool locked, const std::string &attempted)
 {
     if (locked)

@@ -28,7 +28,7 @@ struct User {
     int kind = TAVO_USER_KIND_LOCAL;
     int privilege = 0;
 
-    // Points into this user, and lives as long as it stays as it is.
+    // Points into this user, and is valid until the user changes.
     TAVOUSER Record() const;
 };
 

@@ -30,7 +30,7 @@ std::map<std::string, SambaHashes> ReadSambaHashes()
     return found;
 }
 
-// What the row says goes into the user; an empty value says nothing, except of free texts.
+// Copies the facts of the row into the user; empty values are ignored, except for free texts.
 void ApplyRow(const AccountRow &row, User &user)
 {
     const auto given = [&](const char *column) -> const std::string * {

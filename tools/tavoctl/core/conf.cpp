@@ -109,7 +109,7 @@ Action GiveValue(Arguments &in, decltype(TLIBFileAppendKey) change, const char *
     };
 }
 
-// remove and comment: what becomes of the lines of a key.
+// remove and comment: both change all lines of a key.
 Action TakeAway(Arguments &in, decltype(TLIBFileRemoveKey) change, const char *verb)
 {
     const auto key = in.Text("KEY", conf_key, "the name of the setting");

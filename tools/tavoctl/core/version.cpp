@@ -1,4 +1,4 @@
-// tavoctl version: what runs here, and on what.
+// tavoctl version: the versions of the program and the library, and the machine.
 #include "families.h"
 #include "frame/failure.h"
 #include "frame/host.h"

@@ -35,7 +35,7 @@ using Source = std::unique_ptr<EventSource>;
 
 // Each of these throws a Failure when the kernel does not offer it.
 Source DiskEvents();     // disks come and go
-Source ArrayEvents();    // arrays, their health, their members, what is done to them and how far it has come
+Source ArrayEvents();    // arrays, their health, their members, rebuilds and scrubs with their progress
 Source MountEvents();    // volumes and other file systems on devices
 Source NetworkEvents();  // links and addresses
 Source ServiceEvents();  // services start and end

@@ -41,7 +41,7 @@ class KernelSocket {
             socklen_t size = sizeof sender;
             const ssize_t count =
                 ::recvfrom(fd_, bytes.data(), bytes.size(), 0, reinterpret_cast<sockaddr *>(&sender), &size);
-            // Too many at once: what was lost cannot be had, what follows can.
+            // Too many events at once: some are lost, the following ones are not.
             if (count < 0 && (errno == EINTR || errno == ENOBUFS))
                 continue;
             if (count < 0)

@@ -1,4 +1,5 @@
-// What an argument may be: checked before a verb runs, so that a wrong one is named with what is allowed.
+// The valid values of an argument, checked before a verb runs, so that a message names a wrong one and the allowed
+// values.
 #ifndef TAVOCTL_ARGUMENT_KIND_H
 #define TAVOCTL_ARGUMENT_KIND_H
 

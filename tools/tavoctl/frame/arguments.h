@@ -1,5 +1,5 @@
-// The arguments and options of one verb: declared and read in one place, used for parsing, the help text, the man page and
-// completion.
+// The arguments and options of one verb: declared and read in one place, used for parsing, the help text, the man page
+// and completion.
 #ifndef TAVOCTL_ARGUMENTS_H
 #define TAVOCTL_ARGUMENTS_H
 
@@ -15,7 +15,7 @@
 
 namespace tavoctl {
 
-// What the declarations say of one argument ("KEY") or option ("--file").
+// The declaration of one argument ("KEY") or option ("--file").
 struct ArgumentText {
     std::string name;
     std::string value;  // the name of the value, "" for a flag

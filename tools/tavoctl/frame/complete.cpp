@@ -6,7 +6,7 @@
 namespace tavoctl {
 namespace {
 
-// What may stand where the last of the verb's words does.
+// The candidates for the last of the verb's words.
 std::vector<std::string> OfVerb(const Arguments &declared, const std::vector<std::string> &words)
 {
     std::vector<const ArgumentText *> places;

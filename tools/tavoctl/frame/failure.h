@@ -1,4 +1,4 @@
-// What a verb throws when it cannot do what was asked.
+// The exception of a verb that fails.
 #ifndef TAVOCTL_FAILURE_H
 #define TAVOCTL_FAILURE_H
 
@@ -11,7 +11,7 @@ namespace tavoctl {
 
 struct Failure {
     std::string attempted;    // completes "cannot ..."
-    std::string reason = {};  // what is wrong, when no code says it
+    std::string reason = {};  // the cause, when no code says it
     std::string hint = {};    // empty: what the code usually calls for
     int code = 0;             // of the library; 0: the failure is tavoctl's own
     std::string module = {};  // where in the library; empty: not there
@@ -45,11 +45,11 @@ void Must(bool condition, const std::string &attempted, const HintFor &hint);
 // A failed system call, by its errno.
 Failure SystemFailure(std::string attempted, int error);
 
-// Something that is in use by somebody else.
+// An object that another program uses.
 Failure BusyFailure(std::string attempted, std::string reason, std::string hint = {});
 
 // The same failure, as a lack of permission if that is its cause: the library reports a lock or file that may not be
-// opened like one that somebody holds.
+// opened like one that another program holds.
 Failure WithPermissions(Failure failure);
 
 // An argument that tavoctl itself refuses.

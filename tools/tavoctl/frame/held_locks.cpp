@@ -20,7 +20,7 @@ std::string NamesOf(unsigned mask)
     return names;
 }
 
-// Somebody who watches learns why nothing happens: then the wait goes second by second.
+// At a terminal the reason for the delay is shown; then the wait proceeds second by second.
 bool Take(unsigned request, int timeout, const std::string &names)
 {
     if (!Progress::Visible())

@@ -1,4 +1,4 @@
-// JSON that a caller hands in.
+// JSON from a caller.
 #include "frame/json_document.h"
 
 #include "frame/failure.h"

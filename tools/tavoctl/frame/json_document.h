@@ -1,4 +1,4 @@
-// JSON that a caller hands in.
+// JSON from a caller.
 #ifndef TAVOCTL_JSON_DOCUMENT_H
 #define TAVOCTL_JSON_DOCUMENT_H
 

@@ -11,7 +11,7 @@ namespace tavoctl {
 // The first line begins at column, the others after indent blanks.
 std::string Paragraph(const std::string &text, std::size_t indent = 0, std::size_t column = 0);
 
-// Names on the left, what they mean on the right.
+// Names on the left, their meanings on the right.
 std::string Described(const std::vector<std::pair<std::string, std::string>> &lines);
 
 }  // namespace tavoctl

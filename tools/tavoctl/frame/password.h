@@ -20,7 +20,7 @@ class PasswordChoice {
   public:
     explicit PasswordChoice(Arguments &in);
     std::string For(const std::string &name) const;
-    // Also without anybody who could be asked.
+    // Also without a terminal to ask at.
     bool IsMade() const { return *empty_ || *unknown_; }
 
   private:

@@ -8,15 +8,15 @@ namespace tavoctl {
 
 class PrivateCopy {
   public:
-    // A file that is not there has a copy that is not there. Throws a Failure when the file cannot be read, or could not
-    // be created where it is missing.
+    // A file that is not there has a copy that is not there. Throws a Failure when the file cannot be read, or could
+    // not be created where it is missing.
     explicit PrivateCopy(std::string original);
     ~PrivateCopy();
     PrivateCopy(const PrivateCopy &) = delete;
     PrivateCopy &operator=(const PrivateCopy &) = delete;
 
     const std::string &Path() const { return copy_; }
-    // From the original to the copy as it is now.
+    // From the original to the present copy.
     std::string Difference() const;
 
   private:

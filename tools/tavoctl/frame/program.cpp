@@ -209,7 +209,7 @@ int Program::Run(std::vector<std::string> words) const
     return RunVerb(*family, *verb, Tail(words, 2));
 }
 
-// What other programs ask: the build, shells, tests.
+// Requests of other programs: the build, shells, tests.
 bool Program::RunForTools(const std::vector<std::string> &words) const
 {
     const std::string first = words.empty() ? "" : words[0];

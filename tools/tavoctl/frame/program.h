@@ -90,7 +90,7 @@ std::string ManPage(const Family &family);
 // The pages of all families into a folder, tavoctl-conf.1 and so on.
 void WriteManPages(const Program &program, const std::string &folder);
 
-// What may stand in the place of the last word, one candidate each.
+// The candidates for the last word.
 std::vector<std::string> Complete(const Program &program, std::vector<std::string> words);
 
 // The JSON Schema of a verb's answer, or of a failure for no verb.

@@ -1,4 +1,4 @@
-// What programs can know of the verbs before they call one: JSON Schemas of the answers, and the list of the verbs.
+// Descriptions of the verbs for programs: JSON Schemas of the answers, and the list of the verbs.
 #include "frame/failure.h"
 #include "frame/program.h"
 

@@ -57,7 +57,7 @@ class Record {
     std::vector<std::pair<std::string, Cell>> fields_;
 };
 
-// What a verb changes: a column of an object.
+// A change by a verb: a column of an object.
 struct Change {
     std::string object;
     std::string column;

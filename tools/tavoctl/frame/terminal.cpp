@@ -69,7 +69,7 @@ void Terminal::Page(const std::string &text)
         std::cout << text;
         return;
     }
-    // Somebody who has read enough closes the pager.
+    // A user who has read enough closes the pager.
     (void)!std::fwrite(text.data(), 1, text.size(), pipe);
     const int status = ::pclose(pipe);
     constexpr int no_such_program = 127;

@@ -8,8 +8,8 @@
 
 namespace tavoctl {
 
-// The text with every byte that a terminal could take for a command as "\xNN": control characters, what is not UTF-8,
-// and the invisible characters that turn the direction of text around. Line feeds too, unless keep_lines.
+// The text with every byte that a terminal could take for a command as "\xNN": control characters, bytes that are not
+// UTF-8, and the invisible characters that change the direction of text. Line feeds too, unless keep_lines.
 std::string Printable(std::string_view text, bool keep_lines = false);
 
 // The texts with a separator between them.

@@ -1,6 +1,6 @@
-// What a command is: `tavoctl FAMILY VERB`.
+// Commands: `tavoctl FAMILY VERB`.
 //
-// A verb is a function that declares its arguments and returns what to do with them:
+// A verb is a function that declares its arguments and returns the action for them:
 //
 //     Action ConfGet(Arguments &in)
 //     {
@@ -11,7 +11,7 @@
 //         };
 //     }
 //
-// and is registered with what it does to the machine, what it answers and its texts:
+// It is registered with its effect on the machine, its answer and its texts:
 //
 //     conf.Add("get", reads, Answer::One(setting_columns), R"(Prints the value of KEY.
 //
@@ -31,7 +31,7 @@
 
 namespace tavoctl {
 
-// What a verb does to the machine; this decides which of the common options it has and who may call it.
+// The effect of a verb on the machine. It decides which common options the verb has and who may call it.
 enum Trait : unsigned {
     reads = 0,
     changes = 1,        // root only; --force-host: refused where the machine is not an appliance; --dry-run
@@ -40,7 +40,7 @@ enum Trait : unsigned {
     runs_program = 16,  // its answer is that of a program of the caller's
 };
 
-// What a verb prints as JSON.
+// The JSON answer of a verb.
 struct Answer {
     enum Form { nothing, one, list, document, change, own } form = nothing;
     std::vector<ColumnFacts> columns = {};
@@ -97,14 +97,15 @@ struct Call {
     {
         Print(Record(columns, record));
     }
-    // One value for scripts: as it is, and printable when it goes to a terminal. The record says the same in JSON.
+    // One value for scripts: unchanged, but printable when it goes to a terminal. The record has the same value in
+    // JSON.
     template <class Facts_, std::size_t Count>
     void Value(const std::string &value, const Column<Facts_> (&columns)[Count], const Facts_ &record) const
     {
         PrintValue(value, Record(columns, record));
     }
 
-    // What takes long to find out is asked only when it was chosen.
+    // Facts that take long to find out are read only for chosen columns.
     template <class Facts_, std::size_t Count>
     Table TableOf(const Column<Facts_> (&columns)[Count], const std::vector<Facts_> &records) const
     {

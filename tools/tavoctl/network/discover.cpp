@@ -67,7 +67,7 @@ void StopOnRequest()
         ::sigaction(number, &action, nullptr);
 }
 
-// What is known of the hosts, and what of that is new.
+// The known hosts, and the new ones among them.
 class HostWatch {
   public:
     explicit HostWatch(const Call &call) : call_(call) {}

@@ -1,4 +1,4 @@
-// tavoctl net: what the network is, and single settings of it.
+// tavoctl net: the state of the network, and single settings of it.
 #include "families.h"
 #include "frame/containers.h"
 #include "frame/failure.h"

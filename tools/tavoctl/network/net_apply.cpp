@@ -89,7 +89,7 @@ void RefuseLostGateway(const NetDocument &wanted, const NetDocument &stored)
     throw UsageFailure("take the document", "gateway: " + gateway + " is on the network of no card");
 }
 
-// What the document asks of interfaces that are not in it or not there.
+// The document's references to interfaces that are not listed or do not exist.
 void RefuseUnknown(const NetDocument &wanted, const NetDocument &stored)
 {
     const auto refuse = [](const std::string &card, const std::string &why) {
@@ -125,7 +125,7 @@ void RefuseUnknown(const NetDocument &wanted, const NetDocument &stored)
     RefuseLostGateway(wanted, stored);
 }
 
-// What the start script says that it keeps over a restart of the system.
+// The features that the start script keeps over a restart of the system.
 std::set<std::string> Features()
 {
     std::set<std::string> features;

@@ -23,7 +23,7 @@ std::string AddressText(const TAVONETCARD &card);
 // Throws a Failure when another host uses the address. Nothing is asked where the cable is not plugged in.
 void RefuseUsedAddress(const TAVONETCARD &card, const std::string &address);
 
-// Fills a field of a record; what does not fit is cut.
+// Fills a field of a record; text that does not fit is cut.
 template <std::size_t Size>
 void Put(char (&field)[Size], const std::string &text)
 {

@@ -1,4 +1,4 @@
-// tavoctl net ipv6, wol, bond: what one card, or several together, can do.
+// tavoctl net ipv6, wol, bond: settings of one card, or of several together.
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "network/net_card.h"
@@ -120,7 +120,7 @@ Action NetBonds(Arguments &)
             TAVONETLINKAGGR record = {};
             facts.push_back({bond, {}, MembersOfBond(bond), {}});
             if (TAVONetLinkAggrGet(bond.c_str(), &record) != 0)
-                continue;  // a mode that is none of ours
+                continue;  // a mode that the appliance does not offer
             facts.back().mode = modes[record.nMode];
             facts.back().partner = Maybe(record.szPartner);
         }

@@ -126,13 +126,13 @@ bool IsTooLate(int pid_fd, int signals)
     return !confirmed;
 }
 
-// A program that the killed command left, or somebody else, may hold the lock of the network for a while.
+// A program that the killed command left, or another one, may hold the lock of the network for a while.
 bool Insist(int (*end)())
 {
     const std::int64_t until = Now() + 2 * longest_change * 1000ll;
     while (end() != 0) {
         if (TLIBErrGet() != ERR_LOCK_FAILED || Left(until) == 0)
-            return TLIBErrGet() == ERR_FILE_NOT_FOUND;  // somebody else was faster
+            return TLIBErrGet() == ERR_FILE_NOT_FOUND;  // another process was faster
         ::sleep(1);
     }
     return true;
@@ -188,7 +188,7 @@ NetChange::NetChange(int seconds) : seconds_(seconds)
     const int pid_fd = OpenPidFile();
     int line[2];
     if (::socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, line) != 0)
-        throw Failure{.attempted = question, .reason = "no socket can be had"};
+        throw Failure{.attempted = question, .reason = "no socket can be created"};
     const pid_t pid = ::fork();
     if (pid < 0)
         throw Failure{.attempted = question, .reason = "no process can be started"};
@@ -283,7 +283,7 @@ void NetChange::Confirm()
     if (TLIBProcSignalByPidFile(pid_file, SIGUSR1) != 0)
         throw Failure{.attempted = "keep the new settings",
                       .reason = "none are on trial",
-                      .hint = "the old ones are back, or somebody has confirmed already",
+                      .hint = "the old ones are back, or the new ones are confirmed already",
                       .status = exit_not_found};
     for (int i = 0; i < 500; ++i) {
         if (::access(pid_file, F_OK) != 0)

@@ -1,6 +1,6 @@
-// A change of the network that is kept or given up as a whole, by a checkpoint of the library. A process of its own owns
-// the checkpoint, whatever becomes of the command: it may be cut off with the connection that it came by. On trial the old
-// settings come back unless somebody confirms the new ones in time.
+// A change of the network that is kept or undone as a whole, by a checkpoint of the library. A separate process owns
+// the checkpoint, because the command may be cut off with its connection. On trial the old settings come back unless
+// the new ones are confirmed in time.
 #ifndef TAVOCTL_NET_CHANGE_H
 #define TAVOCTL_NET_CHANGE_H
 

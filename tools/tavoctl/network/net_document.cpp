@@ -136,7 +136,7 @@ void TakeFact(const std::vector<NetItem> &items, const std::string &name, const 
     facts[name] = ValueOf(*item, value, place);
 }
 
-// What no single field shows.
+// Checks across several fields.
 void CheckCard(const std::string &place, NetFactsMap &card)
 {
     const auto has = [&](const char *name) {

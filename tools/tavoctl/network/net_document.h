@@ -18,7 +18,7 @@ struct NetItem {
     const char *name;
     Form form;
     bool may_be_null;     // null: there is none
-    const char *feature;  // what the start script must keep; "" for what every one keeps
+    const char *feature;  // the feature that the start script must have; "" for one that all have
     const char *pattern;  // of the text, or of each of the texts, for the schema; "" for any
     const char *about;
     // Returns the canonical form of the text; nullopt when it is not valid.

@@ -157,7 +157,7 @@ Ipv6Live Ipv6Routes(const std::string &interface, const Words &addresses)
     return found;
 }
 
-// The VLAN's parent and number; "" and 0 of what is none.
+// The VLAN's parent and number; "" and 0 for other interfaces.
 std::pair<std::string, int> VlanOf(const std::string &interface)
 {
     // "eth0.7 | 7 | eth0", below two lines of headings

@@ -6,7 +6,7 @@
 
 namespace tavoctl {
 
-// What "/etc/sysconfig/network-scripts/more-NAME" keeps beside the interface file.
+// The settings in "/etc/sysconfig/network-scripts/more-NAME", beside the interface file.
 struct MoreFile {
     std::vector<std::string> addresses;  // of both families, with their lengths
     std::string ipv6_gateway;            // "" for none

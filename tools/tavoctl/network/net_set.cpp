@@ -44,7 +44,7 @@ TAVONETCARD WantedCard(const std::string &wanted)
     return card;
 }
 
-// What the interface shall have, and the gateway if one was given.
+// The wanted settings of the interface, and the gateway if one was given.
 struct WantedNet {
     TAVONETCARD card;
     std::string text;
@@ -76,7 +76,7 @@ Action NetSet(Arguments &in)
         const TAVONETCARD before = CardNamed("change the address", interface->value_or(""));
         const std::string name = before.szInterface;
         Put(wanted.card.szInterface, name);
-        // What is stored may differ from what the kernel has, so that the change is made in any case.
+        // The stored settings may differ from the kernel's, so the change is always made.
         call.Change(name, "address", Maybe(AddressText(before)), AddressText(wanted.card));
         if (*gateway)
             call.Change("network", "gateway", {}, **gateway);

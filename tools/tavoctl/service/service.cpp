@@ -1,4 +1,4 @@
-// tavoctl service: what the services are doing.
+// tavoctl service: the state of the services.
 #include "service/service.h"
 
 #include "families.h"
@@ -15,8 +15,8 @@
 namespace tavoctl {
 namespace {
 
-// The settings lock, so that every status of one table is of one moment and none of them waits on its own. Where somebody
-// holds it, such as the dispatcher while scripts run, the table says what can be said.
+// The settings lock, so that all statuses of a table are of one moment and none of them waits on its own. While another
+// process holds it, such as the dispatcher while scripts run, the table shows only facts that need no lock.
 class OneMoment {
   public:
     OneMoment() : held_(ErrTLIBFileLock(TAVO_LOCK_TAVOINFO | TAVO_LOCK_SHARED | TAVO_LOCK_NONBLOCKING, 1) == 0) {}

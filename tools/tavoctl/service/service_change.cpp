@@ -74,7 +74,7 @@ void CompareFolders(Call &call, int id)
     }
 }
 
-// What the library's action makes of a service. A state that cannot be known may become another one.
+// The effect of the library's action on a service. An unknown state may become another one.
 struct ServiceAction {
     const char *verb;
     int code;

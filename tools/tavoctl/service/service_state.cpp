@@ -1,4 +1,4 @@
-// A service as it is at this moment.
+// The present state of a service.
 #include "service/service_state.h"
 
 #include "frame/containers.h"

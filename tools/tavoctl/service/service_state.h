@@ -1,4 +1,4 @@
-// A service as it is at this moment.
+// The present state of a service.
 #ifndef TAVOCTL_SERVICE_STATE_H
 #define TAVOCTL_SERVICE_STATE_H
 

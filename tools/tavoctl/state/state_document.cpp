@@ -30,7 +30,7 @@ constexpr Column<UserQuota> saved_quota_columns[] = {
     {"limit_kib", field<&UserQuota::limit>, "null: no limit", in_list, "KiB"},
 };
 
-// What changes without anybody's doing does not belong into a document.
+// Facts that change by themselves do not belong into a document.
 bool IsMomentary(const ColumnFacts &column)
 {
     const std::string name = column.name;

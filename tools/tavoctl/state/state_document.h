@@ -21,10 +21,10 @@ using Sections = std::set<std::string>;
 inline constexpr const char *state_sections[] = {"settings", "users",    "groups", "network",
                                                  "quotas",   "services", "storage"};
 
-// What a document says of a service.
+// A service in a document.
 struct SavedService {
     std::string name;
-    std::optional<bool> enabled;       // nothing: it stays as it is
+    std::optional<bool> enabled;       // nothing: it stays unchanged
     std::vector<std::string> folders;  // "/volume1/music"
 };
 
@@ -40,7 +40,7 @@ std::map<std::string, std::string> ReadSettings(const std::string &path);
 // The section that has this setting; "" for the settings themselves.
 std::string OwnerOfSetting(const std::string &key);
 
-// The state as it is. `secrets`: with the hashes of passwords.
+// The present state. `secrets`: with the hashes of passwords.
 StateJson ReadState(const Call &call, const Sections &sections, bool secrets);
 StateJson ReadStorage();
 

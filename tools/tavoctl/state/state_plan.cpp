@@ -1,4 +1,4 @@
-// The way from the state as it is to that of a document.
+// The changes from the present state to that of a document.
 #include "state/state_plan.h"
 
 #include "account/account_key.h"

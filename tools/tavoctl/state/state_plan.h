@@ -1,4 +1,4 @@
-// The way from the state as it is to that of a document.
+// The changes from the present state to that of a document.
 #ifndef TAVOCTL_STATE_PLAN_H
 #define TAVOCTL_STATE_PLAN_H
 
@@ -22,9 +22,9 @@ class StatePlan {
     // Looks at everything that can be refused, and notes in the call what differs; throws a Failure.
     StatePlan(Call &call, const StateJson &document);
 
-    // Settings, accounts and the network each as a whole; a Failure says what was done before. Then quotas and services,
-    // each for itself: those that fail are warned of, named in the report and left out of its changes. With --dry-run says
-    // only what would fail.
+    // Settings, accounts and the network each as a whole; a Failure says what was done before. Then quotas and
+    // services, each for itself: those that fail are warned of, named in the report and left out of its changes. With
+    // --dry-run says only what would fail.
     void CarryOut(Call &call, bool probe);
 
     // A warning of everything that will not be done. True when there is something.

@@ -42,7 +42,7 @@ std::string MemberOf(const RAIDINFO &info, const std::string &word);
 // A file of the kernel's about an array, "/sys/block/md2/md/sync_action".
 std::string ArrayFile(const std::string &path, const std::string &name);
 
-// What the kernel does to an array: "recover", "resync", "reshape", "check"; empty when nothing.
+// The kernel's present work on an array: "recover", "resync", "reshape", "check"; empty for none.
 std::string ActionOf(const RAIDINFO &info);
 
 struct Rebuild {

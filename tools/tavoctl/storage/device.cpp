@@ -64,7 +64,7 @@ bool IsDiskName(const std::string &word)
            !std::isdigit(static_cast<unsigned char>(word.back()));
 }
 
-// The number of the port that a disk hangs on: of ".../ata4/host3/target3:0:0/3:0:0:0" 4, of ".../0:0:3:0" 3.
+// The number of a disk's port: of ".../ata4/host3/target3:0:0/3:0:0:0" 4, of ".../0:0:3:0" 3.
 std::optional<int> PortOf(const std::string &name)
 {
     std::error_code none;

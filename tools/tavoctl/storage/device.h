@@ -62,7 +62,7 @@ std::vector<Mount> Mounts();
 // Returns why a device must not be overwritten, such as "/dev/sda1 is mounted on /mnt"; empty when it is unused.
 std::string UseOf(const std::string &device);
 
-// Throws a Failure when a device is in use, or is none.
+// Throws a Failure when a path is a device in use, or not a device.
 void RefuseUsed(const std::vector<std::string> &devices, const std::string &attempted);
 
 // A 32-bit kernel reaches 16 TiB of one device: throws a Failure when a device of so many bytes is larger.

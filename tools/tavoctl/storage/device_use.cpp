@@ -1,4 +1,4 @@
-// Who uses a block device: a mount, swap, an array, a volume, or somebody who has it for himself.
+// Finds the user of a block device: a mount, swap, an array, a volume, or a program that has opened it exclusively.
 #include "frame/failure.h"
 #include "frame/folder_names.h"
 #include "storage/device.h"

@@ -1,4 +1,4 @@
-// NVMe disks, which sit in no bay: what the kernel and the drive say of them. Nothing is changed.
+// NVMe disks, which do not sit in a bay: facts from the kernel and the drive. Nothing is changed.
 #ifndef TAVOCTL_NVME_H
 #define TAVOCTL_NVME_H
 

@@ -50,7 +50,7 @@ std::string WhyNot(const StoppedArray &array, const std::vector<StoppedArray> &a
     return "";
 }
 
-// What an attempt has gathered and not started would hold the members.
+// An array that an attempt has assembled but not started would hold the members.
 void LetGo(const std::string &path)
 {
     if (std::filesystem::exists(ArrayFile(path, "array_state")) && !Runs(path))

@@ -22,7 +22,7 @@ struct SmartAttribute {
 // Throws a Failure when the drive cannot be read. This wakes it.
 std::vector<SmartAttribute> ReadSmart(const std::string &disk, const std::string &attempted);
 
-// What most makers mean by an attribute; "" for one that each takes for something else.
+// The usual meaning of an attribute; "" for one that every maker uses differently.
 const char *SmartName(int id);
 
 }  // namespace tavoctl

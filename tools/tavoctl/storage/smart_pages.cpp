@@ -1,4 +1,4 @@
-// What the pages of a drive say of its health.
+// The health of a drive from its pages.
 #include "storage/smart_pages.h"
 
 namespace tavoctl {
@@ -20,7 +20,7 @@ constexpr Name names[] = {
     {242, "sectors read"},
 };
 
-constexpr std::size_t execution_status = 363;  // what came of it, and how many tenths are left
+constexpr std::size_t execution_status = 363;  // the result, and the tenths that are left
 constexpr std::size_t short_minutes_at = 372;
 constexpr std::size_t long_minutes_at = 373;
 constexpr std::size_t long_minutes_word = 375;  // when they do not fit a byte

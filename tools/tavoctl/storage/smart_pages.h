@@ -1,4 +1,4 @@
-// What the pages of a drive say of its health.
+// The health of a drive from its pages.
 #ifndef TAVOCTL_SMART_PAGES_H
 #define TAVOCTL_SMART_PAGES_H
 
@@ -27,7 +27,7 @@ struct Verdict {
 };
 Verdict Judge(const std::vector<SmartAttribute> &attributes, const SelfTest &test);
 
-// What the health log of an NVMe disk says; nothing for a page that is none.
+// The verdict of an NVMe disk's health log; nothing for another page.
 struct NvmeHealth {
     int temperature;  // degrees Celsius
     std::string text;

@@ -45,7 +45,7 @@ class Tree {
     {
         for (const DiskFacts &disk : AllDisks(false, arrays_))
             disk.there ? AddDisk(disk) : AddEmptyBay(disk);
-        // What is only on disks that are gone.
+        // Arrays and volumes that are only on missing disks.
         for (const Array &array : arrays_)
             AddArray(*array, -1);
         for (const Volume &volume : volumes_)
@@ -126,7 +126,7 @@ class Tree {
         }
     }
 
-    // What the mounts and the arrays say of a disk or partition.
+    // The mounts and arrays on a disk or partition.
     void LookAt(Node &node, const std::string &path) const
     {
         for (const Mount &mount : mounts_)

@@ -22,7 +22,8 @@ struct Volume {
     std::optional<int> Number() const;
 };
 
-// Those that the kernel has, without reading a disk; with all also those of groups that are not active, which reads them.
+// Those that the kernel has, without reading a disk; with all also those of groups that are not active, which reads
+// them.
 std::vector<Volume> ReadVolumes(bool all);
 
 inline constexpr char volume_help[] = "its number, 1 for /volume1";
@@ -30,7 +31,7 @@ inline constexpr char volume_help[] = "its number, 1 for /volume1";
 std::string VolumePath(int number);     // "/volume1"
 std::string VolumeGroupOf(int number);  // "/dev/vg1"
 
-// What the first blocks of a device say of an ext2, ext3 or ext4 file system.
+// An ext2, ext3 or ext4 file system, by the first blocks of its device.
 struct ExtFileSystem {
     uint64_t size;  // bytes
     bool clean;     // no errors were noticed while it was mounted
