@@ -79,7 +79,7 @@ int Set(const char *interface, bool on, const std::string &options, uint32_t bit
     if (!tells)
         return Fail(ERR_OP_FAILURE);
     tavo::Checkpoint before;
-    before.AddSetting(kSettings, tavo::WakeOptionsKey(interface));
+    before.AddSetting(tavo::kSettings, tavo::WakeOptionsKey(interface));
     before.Begin();
     int code = Store(interface, options);
     if (code == 0 && *tells)
