@@ -8,6 +8,9 @@
  * A physical volume is "/dev/" and a kernel name. A volume group is "/dev/vg" and letters, digits, "_.+-". Other text
  * is refused before any program runs. The LVM tools do all the work. Nothing is locked. Failures are logged; a code is
  * recorded only where one is named.
+ *
+ * A device or a group that is larger than the kernel can reach as one volume (16 TiB with a 32-bit one) is refused before
+ * anything is written: -1, logged.
  */
 #ifndef TAVO_LVM_H
 #define TAVO_LVM_H

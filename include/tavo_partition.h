@@ -2,9 +2,10 @@
  * Partitions: the layouts that the system disks carry and have carried, and making and removing them.
  *
  * Partition 1 of a system disk holds the system, partition 2 is swap, partition 3 takes the rest for data; on models
- * with RAID each is a member of an array. The exact sectors have changed over the years: every geometry ever shipped is
- * listed in grgAllTavoPartLayout and is recognised. The table is an MS-DOS one, so it reaches 2^32 sectors of 512
- * bytes.
+ * with RAID each is a member of an array. The exact sectors have changed over the years: every geometry ever shipped
+ * is listed in grgAllTavoPartLayout and is recognised. The table is an MS-DOS one, on disks of more than 2^32 sectors a
+ * GUID partition table. A disk that is larger than the kernel can reach (16 TiB with a 32-bit one) is refused before
+ * anything is written, which is logged.
  *
  * Changes are made by the appliance's own /sbin/sfdisk. A disk is "/dev/sda"; text that is not a device name (see
  * tavo_disk.h) is refused before any program runs. Nothing is locked. All failures are logged; none of these functions

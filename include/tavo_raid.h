@@ -212,8 +212,9 @@ TAVO_API int RAIDUUIDGet(const char *szPath, char *szUuid, int cbUuid);
  * Runs: /sbin/mdadm */
 TAVO_API int RAIDDiskIsUsedByRAID(const char *szDisk, int *pnArray);
 
-/* --- changing arrays. All return 0, or -1, logged; ERR_BAD_PARAMETERS for an argument that is not an array or device
- * --- */
+/* --- changing arrays. All return 0, or -1, logged; ERR_BAD_PARAMETERS for an argument that is not an array or device.
+ * A member or an array that is larger than the kernel can reach (16 TiB with a 32-bit one) is refused before anything is
+ * written: -1 without a code --- */
 
 /* Creates an array and tunes it. The data on the members is lost.
  * Files: /sys/block/mdN/md

@@ -1,8 +1,10 @@
 // Makes physical volumes, their group and its volume.
 #include "tavo_lvm.h"
 
+#include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "storage/detail/device_name.h"
+#include "storage/detail/kernel_reach.h"
 #include "storage/detail/volume_name.h"
 
 #include <cstdio>
@@ -17,18 +19,25 @@ extern "C" int LVMCreate(const TLIBSZLIST *pslDevices, const char *szVg, const c
         LogError("%s:%d Bad parameters");
         return -1;
     }
-    for (int i = 0; i < pslDevices->nItem; ++i) {
-        if (LVMPvCreate(pslDevices->pszItem[i]) != 0)
+    return Guard([&] {
+        const std::string beyond = tavo::GroupBeyondReach(szVg, *pslDevices);
+        if (!beyond.empty()) {
+            LogError("%s:%d %s", beyond);
             return -1;
-    }
-    if (LVMVgCreate(szVg, pslDevices) != 0)
-        return -1;
-    LVMVG vg;
-    if (const int result = LVMVgSBGet(szVg, &vg); result != 1) {
-        LogError("%s:%d failed to get VG superblock: %s, ret = %d", szVg, result);
-        return -1;
-    }
-    if (szUuid)
-        std::snprintf(szUuid, static_cast<size_t>(cbUuid), "%s", vg.szUuid);
-    return LVMLvCreate(szVg, szLv);
+        }
+        for (int i = 0; i < pslDevices->nItem; ++i) {
+            if (LVMPvCreate(pslDevices->pszItem[i]) != 0)
+                return -1;
+        }
+        if (LVMVgCreate(szVg, pslDevices) != 0)
+            return -1;
+        LVMVG vg;
+        if (const int result = LVMVgSBGet(szVg, &vg); result != 1) {
+            LogError("%s:%d failed to get VG superblock: %s, ret = %d", szVg, result);
+            return -1;
+        }
+        if (szUuid)
+            std::snprintf(szUuid, static_cast<size_t>(cbUuid), "%s", vg.szUuid);
+        return LVMLvCreate(szVg, szLv);
+    });
 }

@@ -4,6 +4,7 @@
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "storage/detail/device_name.h"
+#include "storage/detail/kernel_reach.h"
 #include "storage/detail/partition_command.h"
 
 extern "C" int LVMPvExpand(const LVMVGINFO *pInfo)
@@ -13,6 +14,12 @@ extern "C" int LVMPvExpand(const LVMVGINFO *pInfo)
         return -1;
     }
     return Guard([&] {
+        // Its volume would fill it.
+        const std::string beyond = tavo::GroupBeyondReach(pInfo->szVg, *pInfo->pslPvs);
+        if (!beyond.empty()) {
+            LogError("%s:%d %s", beyond);
+            return -1;
+        }
         int result = 0;
         for (int i = 0; i < pInfo->pslPvs->nItem; ++i) {
             const char *const device = pInfo->pslPvs->pszItem[i];

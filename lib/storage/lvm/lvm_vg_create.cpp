@@ -4,6 +4,7 @@
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "storage/detail/device_name.h"
+#include "storage/detail/kernel_reach.h"
 #include "storage/detail/partition_command.h"
 #include "storage/detail/volume_name.h"
 
@@ -27,6 +28,11 @@ extern "C" int LVMVgCreate(const char *szVg, const TLIBSZLIST *pslDevices)
         return -1;
     }
     return Guard([&] {
+        const std::string beyond = tavo::GroupBeyondReach(szVg, *pslDevices);
+        if (!beyond.empty()) {
+            LogError("%s:%d %s", beyond);
+            return -1;
+        }
         std::string devices;
         for (int i = 0; i < pslDevices->nItem; ++i)
             devices.append(" ").append(pslDevices->pszItem[i]);

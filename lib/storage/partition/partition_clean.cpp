@@ -6,6 +6,7 @@
 #include "core/detail/log.h"
 #include "storage/detail/device_name.h"
 #include "storage/detail/device_use.h"
+#include "storage/detail/kernel_reach.h"
 #include "storage/detail/open_disk.h"
 #include "storage/detail/partition_command.h"
 
@@ -68,6 +69,11 @@ extern "C" int PartitionClean(const char *szDisk, int flags)
         const bool system = (flags & PARTITION_SYSTEM) != 0;
         if (!data && !system)
             return 0;
+        const std::string beyond = tavo::DeviceBeyondReach(szDisk);
+        if (!beyond.empty()) {
+            LogError("%s:%d %s", beyond);
+            return -1;
+        }
         // The empty table of the system's partitions takes all the others along.
         const int first = system ? 1 : kFirstData;
         const std::string used = tavo::UsedPartition(szDisk, first, tavo::kLastPartition);

@@ -6,6 +6,7 @@
 #include "core/detail/model_setting.h"
 #include "storage/detail/device_name.h"
 #include "storage/detail/device_use.h"
+#include "storage/detail/kernel_reach.h"
 #include "storage/detail/partition_command.h"
 
 namespace {
@@ -64,6 +65,11 @@ extern "C" int PartitionCreate(const char *szDisk, int flags, const int *pVersio
         const bool data = (flags & PARTITION_DATA) != 0;
         if (!data && (flags & PARTITION_SYSTEM) == 0)
             return 0;
+        const std::string beyond = tavo::DeviceBeyondReach(szDisk);
+        if (!beyond.empty()) {
+            LogError("%s:%d %s", beyond);
+            return -1;
+        }
         // The empty table that the system's partitions begin with takes all others along.
         const int first = data ? kData : 1;
         const std::string used = tavo::UsedPartition(szDisk, first, data ? kData : tavo::kLastPartition);

@@ -4,6 +4,7 @@
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "storage/detail/array_name.h"
+#include "storage/detail/kernel_reach.h"
 #include "storage/detail/partition_command.h"
 
 extern "C" int RAIDAdd(const RAIDINFO *pInfo, const char *szMember)
@@ -25,6 +26,13 @@ extern "C" int RAIDAdd(const RAIDINFO *pInfo, const char *szMember)
             break;
         default:
             LogError("%s:%d Bad raid level to add disk: %d", pInfo->fLevel);
+            return -1;
+        }
+        std::string beyond = tavo::DeviceBeyondReach(szMember);
+        if (beyond.empty() && pInfo->fLevel == RAID_LEVEL_LINEAR)
+            beyond = tavo::LongerArrayBeyondReach(pInfo->szPath, szMember);
+        if (!beyond.empty()) {
+            LogError("%s:%d %s", beyond);
             return -1;
         }
         const int status = tavo::RunDiskCommand(format, pInfo->szPath, szMember).status;

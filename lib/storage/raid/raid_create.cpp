@@ -6,6 +6,7 @@
 #include "core/detail/log.h"
 #include "storage/detail/array_level.h"
 #include "storage/detail/array_name.h"
+#include "storage/detail/kernel_reach.h"
 #include "storage/detail/partition_command.h"
 
 #include <optional>
@@ -61,11 +62,12 @@ std::string MemberArgument(const RAIDREQUEST &request)
     return argument;
 }
 
+constexpr uint64_t kKib = 1024;
+
 std::string SizeOption(const RAIDREQUEST &request)
 {
-    constexpr uint64_t kib = 1024;
     if (request.cbArray > 0)
-        return "-z " + std::to_string(request.cbArray / kib);
+        return "-z " + std::to_string(request.cbArray / kKib);
     const unsigned long limit = RAIDSizeLimitGet();
     return limit > 0 ? "-z " + std::to_string(limit) : "";
 }
@@ -107,6 +109,15 @@ extern "C" int RAIDCreate(const RAIDREQUEST *pRequest)
         if (!option) {
             LogError("%s:%d unknown raid level: %d", pRequest->fLevel);
             return Fail(ERR_BAD_PARAMETERS);
+        }
+        const std::string beyond = tavo::ArrayBeyondReach(
+            pRequest->szPath, {.level = pRequest->fLevel,
+                               .slots = pRequest->nSlot,
+                               .member_limit = pRequest->cbArray > 0 ? pRequest->cbArray : RAIDSizeLimitGet() * kKib,
+                               .members = pRequest->pslMembers});
+        if (!beyond.empty()) {
+            LogError("%s:%d %s", beyond);
+            return -1;
         }
         // A command that is cut could create some other array.
         const std::string members = MemberArgument(*pRequest);

@@ -4,6 +4,7 @@
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "storage/detail/array_name.h"
+#include "storage/detail/kernel_reach.h"
 #include "storage/detail/partition_command.h"
 
 extern "C" int RAIDDevCountChange(const RAIDINFO *pInfo, int nSlot)
@@ -13,6 +14,13 @@ extern "C" int RAIDDevCountChange(const RAIDINFO *pInfo, int nSlot)
         return Fail(ERR_BAD_PARAMETERS);
     }
     return Guard([&] {
+        const std::string beyond = tavo::ArrayBeyondReach(
+            pInfo->szPath,
+            {.level = pInfo->fLevel, .slots = nSlot, .member_limit = pInfo->cbMember, .members = nullptr});
+        if (!beyond.empty()) {
+            LogError("%s:%d %s", beyond);
+            return -1;
+        }
         const auto result = tavo::RunDiskCommand("/sbin/mdadm --grow %s -n %d >/dev/null 2>&1\n", pInfo->szPath, nSlot);
         if (result.status == 0)
             return 0;

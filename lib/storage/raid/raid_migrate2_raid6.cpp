@@ -6,6 +6,7 @@
 #include "core/detail/log.h"
 #include "storage/detail/array_name.h"
 #include "storage/detail/device_use.h"
+#include "storage/detail/kernel_reach.h"
 #include "storage/detail/member_size.h"
 #include "storage/detail/open_disk.h"
 #include "storage/detail/partition_command.h"
@@ -54,6 +55,14 @@ extern "C" int RAIDMigrate2RAID6(const RAIDINFO *pInfo, const TLIBSZLIST *pslMem
     return Guard([&] {
         if (IsUnfit(*pInfo, *pslMembers))
             return -1;
+        const std::string beyond = tavo::ArrayBeyondReach(pInfo->szPath, {.level = RAID_LEVEL_6,
+                                                                           .slots = pslMembers->nItem - 1,
+                                                                           .member_limit = pInfo->cbMember,
+                                                                           .members = nullptr});
+        if (!beyond.empty()) {
+            LogError("%s:%d %s", beyond);
+            return -1;
+        }
         const auto result = tavo::RunDiskCommand("/bin/echo raid6  > /sys/block/md%d/md/level", *array);
         if (result.status != 0) {
             LogError("%s:%d Failed to do '%s', err=%d", result.command, result.status);

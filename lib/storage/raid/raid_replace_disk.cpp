@@ -10,6 +10,7 @@
 #include "storage/detail/device_use.h"
 #include "storage/detail/disk_path.h"
 #include "storage/detail/disk_size.h"
+#include "storage/detail/kernel_reach.h"
 #include "storage/detail/kernel_text.h"
 #include "storage/detail/member_size.h"
 #include "storage/detail/open_disk.h"
@@ -162,9 +163,11 @@ extern "C" int RAIDReplaceDisk(const RAIDINFO *pInfo, const char *szOld, const c
         const int64_t sectors = PlanPartitions(szNew, plan);
         if (sectors < 0)
             return -1;
-        const std::string used = UserOfNew(szNew, plan);
-        if (!used.empty()) {
-            LogError("%s:%d %s", used);
+        std::string hindrance = UserOfNew(szNew, plan);
+        if (hindrance.empty())
+            hindrance = tavo::DeviceBeyondReach(szNew);
+        if (!hindrance.empty()) {
+            LogError("%s:%d %s", hindrance);
             return -1;
         }
         if (!IsLargeEnough(*pInfo, plan, sectors)) {

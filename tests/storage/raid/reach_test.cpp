@@ -1,0 +1,165 @@
+// Devices beyond the 16 TiB that a 32-bit kernel reaches: refused there before any program runs, and nowhere else.
+#include "tavo_lvm.h"
+#include "tavo_partition.h"
+#include "tavo_raid.h"
+
+#include "support/captured_log.h"
+#include "support/container_text.h"
+#include "support/device_tree.h"
+#include "support/recorded_calls.h"
+#include "support/recorded_commands.h"
+
+#include <gmock/gmock.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <functional>
+
+#include <linux/fs.h>
+#include <sys/syscall.h>
+#include <sys/utsname.h>
+#include <unistd.h>
+
+namespace {
+
+const char *machine_answer = nullptr;
+
+}  // namespace
+
+extern "C" int uname(struct utsname *name) noexcept
+{
+    const auto result = static_cast<int>(::syscall(SYS_uname, name));
+    if (machine_answer)
+        std::snprintf(name->machine, sizeof name->machine, "%s", machine_answer);
+    return result;
+}
+
+namespace {
+
+using test::MakeList;
+
+constexpr uint64_t kTib = uint64_t{1} << 40;
+
+class Reach : public testing::Test {
+  protected:
+    Reach()
+    {
+        tree_.Put("/etc.defaults/tavoinfo.conf", "supportraid=yes\n");
+        for (const char *device : {"sda", "sda1", "sda2", "sda3", "sdb3", "sdc3", "sdd3", "md2", "md3"})
+            tree_.Put(std::string("/dev/") + device, "");
+        calls_.OnIoctl([this](int, unsigned long request, void *argument) {
+            if (request != BLKGETSIZE64) {
+                errno = ENOTTY;
+                return -1;
+            }
+            *static_cast<uint64_t *>(argument) = device_bytes_;
+            return 0;
+        });
+    }
+    ~Reach() override { machine_answer = nullptr; }
+
+    int Create(int level, std::initializer_list<const char *> members, int slots, uint64_t used = 0)
+    {
+        const test::List list = MakeList(std::vector<std::string>(members.begin(), members.end()));
+        RAIDREQUEST request = {};
+        request.szPath = "/dev/md2";
+        request.fLevel = level;
+        request.nSlot = slots;
+        request.cbArray = used;
+        request.pslMembers = list.get();
+        return RAIDCreate(&request);
+    }
+
+    // Whether it is refused, with its reason, before a program runs.
+    bool IsRefused(const std::function<int()> &call)
+    {
+        commands_.Clear();
+        log_.Clear();
+        const int result = call();
+        const bool said = !log_.Texts().empty() && log_.Texts()[0].ends_with(kReason);
+        EXPECT_EQ(said, commands_.Commands().empty()) << testing::PrintToString(log_.Texts());
+        EXPECT_EQ(said, result == -1);
+        return said;
+    }
+
+    static constexpr const char *kReason = "is larger than the 16 TiB of one device that this system can reach";
+    uint64_t device_bytes_ = 0;  // of every device
+    test::DeviceTree tree_;
+    test::CapturedLog log_;
+    test::RecordedCalls calls_;
+    test::RecordedCommands commands_;
+};
+
+TEST_F(Reach, NothingBeyondItIsMade)
+{
+    const RAIDINFO linear = {2, "/dev/md2", RAID_LEVEL_LINEAR, 1, 0, 8 * kTib, 0, 2, 2, 0, nullptr};
+    const RAIDINFO raid5 = {2, "/dev/md2", RAID_LEVEL_5, 1, 0, 8 * kTib, 4 * kTib, 3, 3, 0, nullptr};
+    const int version = 7;
+    const auto group = MakeList({"/dev/md2", "/dev/md3"});
+    LVMVGINFO *const info = LVMVgInfoAlloc();
+    ASSERT_TRUE(info);
+    std::snprintf(info->szVg, sizeof info->szVg, "/dev/vg1");
+    ASSERT_GE(TLIBSzListPush(&info->pslPvs, "/dev/md2"), 0);
+    ASSERT_GE(TLIBSzListPush(&info->pslPvs, "/dev/md3"), 0);
+    commands_.OnCommand([](const std::string &command) -> test::CommandReply {
+        return {0, command.starts_with("/sbin/vgs") ? "  lSQfeY-dso4-NzXN-Hbdv-wh1J-WThm-cNRXi7\n" : ""};
+    });
+    const struct {
+        const char *what;
+        uint64_t largest;  // device that is taken
+        std::function<int()> call;
+    } rows[] = {
+        {"table", 16 * kTib, [] { return PartitionAddTable("/dev/sda"); }},
+        {"system", 16 * kTib, [&] { return PartitionCreate("/dev/sda", PARTITION_SYSTEM, &version); }},
+        {"data", 16 * kTib, [&] { return PartitionCreate("/dev/sda", PARTITION_DATA, &version); }},
+        {"clean", 16 * kTib, [] { return PartitionClean("/dev/sda", PARTITION_SYSTEM | PARTITION_DATA); }},
+        {"linear", 8 * kTib, [&] { return Create(RAID_LEVEL_LINEAR, {"/dev/sda3", "/dev/sdb3"}, 2); }},
+        {"RAID 0", 8 * kTib, [&] { return Create(RAID_LEVEL_0, {"/dev/sda3", "/dev/sdb3"}, 2); }},
+        {"RAID 1", 16 * kTib, [&] { return Create(RAID_LEVEL_1, {"/dev/sda3", "/dev/sdb3"}, 2); }},
+        {"a part of RAID 1", 16 * kTib, [&] { return Create(RAID_LEVEL_1, {"/dev/sda3", "/dev/sdb3"}, 2, kTib); }},
+        {"RAID 5", 8 * kTib, [&] { return Create(RAID_LEVEL_5, {"/dev/sda3", "/dev/sdb3", "/dev/sdc3"}, 3); }},
+        {"RAID 5, degraded", 4 * kTib, [&] { return Create(RAID_LEVEL_5, {"/dev/sda3", "/dev/sdb3"}, 5); }},
+        {"RAID 6", 8 * kTib, [&] { return Create(RAID_LEVEL_6, {"/dev/sda3", "/dev/sdb3"}, 4); }},
+        {"RAID 10", 8 * kTib, [&] { return Create(RAID_LEVEL_10, {"/dev/sda3", "/dev/sdb3"}, 4); }},
+        {"longer", 8 * kTib, [&] { return RAIDAdd(&linear, "/dev/sdb3"); }},
+        {"a member", 16 * kTib, [&] { return RAIDAdd(&raid5, "/dev/sdd3"); }},
+        {"volume", 16 * kTib, [] { return LVMPvCreate("/dev/md2"); }},
+        {"group", 8 * kTib, [&] { return LVMVgCreate("/dev/vg1", group.get()); }},
+        {"all of it", 8 * kTib, [&] { return LVMCreate(group.get(), "/dev/vg1", "lv", nullptr, 0); }},
+        {"grown", 8 * kTib, [&] { return LVMPvExpand(info); }},
+    };
+    for (const auto &row : rows) {
+        SCOPED_TRACE(row.what);
+        machine_answer = "armv7l";
+        device_bytes_ = row.largest;
+        EXPECT_FALSE(IsRefused(row.call));
+        device_bytes_ = row.largest + (1 << 20);
+        EXPECT_TRUE(IsRefused(row.call));
+        device_bytes_ = 0;
+        EXPECT_FALSE(IsRefused(row.call)) << "of unknown size";
+        device_bytes_ = 40 * kTib;
+        for (const char *wide : {"x86_64", "aarch64", "armv8l"}) {
+            machine_answer = wide;
+            EXPECT_FALSE(IsRefused(row.call)) << wide;
+        }
+    }
+    LVMVgInfoFree(info);
+}
+
+TEST_F(Reach, NoArrayGrowsBeyondIt)
+{
+    machine_answer = "armv7l";
+    device_bytes_ = 4 * kTib;
+    const RAIDINFO raid5 = {2, "/dev/md2", RAID_LEVEL_5, 1, 0, 8 * kTib, 4 * kTib, 3, 3, 0, nullptr};
+    EXPECT_FALSE(IsRefused([&] { return RAIDDevCountChange(&raid5, 5); }));
+    EXPECT_TRUE(IsRefused([&] { return RAIDDevCountChange(&raid5, 6); }));
+    const RAIDINFO raid1 = {2, "/dev/md2", RAID_LEVEL_1, 1, 0, 8 * kTib, 8 * kTib, 2, 2, 0, nullptr};
+    EXPECT_FALSE(IsRefused([&] { return RAIDDevCountChange(&raid1, 9); }));
+    EXPECT_FALSE(IsRefused([&] { return RAIDDevCountChange(&raid5, 1); })) << "mdadm's to refuse";
+    // The level cannot be changed back, so the size is looked at before it.
+    const test::List eight = MakeList(std::vector<std::string>(8, "/dev/sdd3"));
+    EXPECT_TRUE(IsRefused([&] { return RAIDMigrate2RAID6(&raid5, eight.get()); }));
+    EXPECT_FALSE(IsRefused([&] { return RAIDMigrate2RAID6(&raid5, MakeList({"/dev/sdd3"}).get()); }));
+}
+
+}  // namespace
