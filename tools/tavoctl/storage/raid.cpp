@@ -235,6 +235,14 @@ started again. An array that is in use is refused.
 tavoctl raid remove md2 sdd3
 tavoctl raid remove md3)",
              RaidTakeOut);
+    raid.Add("grow", changes | destroys, Answer::Change(), R"(Makes an array in order larger: by new MEMBERs, over which
+its data is spread in the background, or without MEMBER to all the room that its members have, after each of them was
+replaced by a larger one. What is on new members is lost; one that is in use or too small is refused. Then `volume grow`
+has the volume on it use the room.
+
+tavoctl raid grow --wait md2 sde3
+tavoctl raid grow md2)",
+             RaidGrow);
     raid.Add("migrate", changes | destroys, Answer::Change(),
              R"(Turns a RAID 5 into a RAID 6 with a new member, which is
 rebuilt onto in the background. With more new members the array must have as many slots as there are new members, minus

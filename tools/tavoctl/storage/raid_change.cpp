@@ -5,6 +5,9 @@
 #include "frame/failure.h"
 #include "storage/arrays.h"
 #include "storage/device.h"
+#include "storage/system_tool.h"
+
+#include "tavo_appliance.h"
 
 #include <algorithm>
 
@@ -61,6 +64,44 @@ void RefuseUsedArray(const std::string &path, const std::string &attempted)
 {
     if (const std::string use = UseOf(path); !use.empty())
         throw BusyFailure(attempted, use, "free it first");
+}
+
+// To all the room that the members have.
+void GrowMembers(Call &call, const RAIDINFO &array, const std::string &attempted)
+{
+    constexpr uint64_t kib = 1024;
+    const std::string name = array.szPath;
+    uint64_t room = 0;
+    const int expansible = RAIDExpansible(&array, &room);
+    Must(expansible >= 0, attempted, log_hint);
+    if (expansible == 0)
+        return;
+    RefuseTooLarge(SizeToBe(array.fLevel, {}, array.nSlot, room * kib), attempted);
+    call.Change(name, "member_size", array.cbMember, room * kib);
+    if (!call.Proceed())
+        return;
+    const bool limited = RAIDSizeLimitGet() > 0;
+    RunTool({"/sbin/mdadm", "--grow", name, "--size=" + (limited ? std::to_string(room) : "max")}, attempted);
+    // The superblock may need what looked like room.
+    if (ReadArray(name)->cbMember == array.cbMember)
+        call.report.changes.clear();
+}
+
+void GrowSlots(Call &call, const RAIDINFO &array, const std::vector<std::string> &paths, const std::string &attempted)
+{
+    const std::string name = array.szPath;
+    const int slots = array.nSlot + static_cast<int>(paths.size());
+    RefuseTwice(paths, attempted);
+    RefuseUsed(paths, attempted);
+    RefuseTooLarge(SizeToBe(array.fLevel, {}, slots, array.cbMember), attempted);
+    call.Change(name, "members", {}, paths);
+    call.Change(name, "slots", array.nSlot, slots);
+    if (!call.Proceed(LossOf(paths)))
+        return;
+    for (const std::string &path : paths)
+        Must(RAIDAddRobustCheck(&array, path.c_str()) == 0, "add " + path + " to " + name,
+             HintFor{ERR_NOT_ENOUGH_SPACE, "take a larger one", log_hint});
+    Must(RAIDDevCountChange(&array, slots) == 0, attempted, log_hint);
 }
 
 }  // namespace
@@ -156,6 +197,30 @@ Action RaidTakeOut(Arguments &in)
             return;
         for (const std::string &path : paths)
             Must(RAIDRemoveDisk(array.get(), path.c_str()) == 0, "remove " + path + " from " + name, log_hint);
+    };
+}
+
+Action RaidGrow(Arguments &in)
+{
+    const auto word = in.Text("ARRAY", array_kind, array_help);
+    const auto words = in.Texts("MEMBER", device_kind, member_help, 0);
+    const auto wait = in.Flag("--wait", "until the array is in order in its new size");
+    return [=](Call &call) {
+        const Array array = ReadArray(ArrayPath(*word));
+        const std::string name = array->szPath;
+        const std::string attempted = "grow " + name;
+        if ((array->fLevel & (RAID_LEVEL_1 | RAID_LEVEL_5 | RAID_LEVEL_6)) == 0)
+            throw Failure{.attempted = attempted, .reason = "a " + LevelText(array->fLevel) + " does not grow"};
+        if (array->fRebuilding)
+            throw BusyFailure(attempted, "it is being rebuilt", "tavoctl raid wait waits for the end");
+        if (array->nStatus != RAID_STATUS_NORMAL)
+            throw Failure{.attempted = attempted,
+                          .reason = std::string("it is ") + StatusText(array->nStatus),
+                          .hint = "tavoctl raid replace gives it a new disk"};
+        const std::vector<std::string> paths = DevicePaths(*words);
+        paths.empty() ? GrowMembers(call, *array, attempted) : GrowSlots(call, *array, paths, attempted);
+        if (*wait && !call.dry_run)
+            WaitForArray(name, 0);
     };
 }
 

@@ -12,6 +12,7 @@ namespace tavoctl {
 Action RaidCreate(Arguments &in);
 Action RaidAdd(Arguments &in);
 Action RaidTakeOut(Arguments &in);
+Action RaidGrow(Arguments &in);
 Action RaidMigrate(Arguments &in);
 Action RaidHalt(Arguments &in);
 Action RaidErase(Arguments &in);
