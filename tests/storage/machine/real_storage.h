@@ -25,8 +25,8 @@ class StorageTest : public MachineTest {
     {
         if (!OnMachine())
             return;
-        Shell("grep ' /mnt' /proc/mounts | while read -r source place rest; do umount $place; done");
-        Told("/usr/lib/tavo-machine/reset; rm -rf /dev/vg*");
+        Shell("grep -E ' /(mnt|volume)' /proc/mounts | while read -r source place rest; do umount $place; done");
+        Told("/usr/lib/tavo-machine/reset; rm -rf /dev/vg* /volume*");
     }
 };
 
@@ -98,6 +98,12 @@ inline void PlugLargeDisks(int count, int mib)
         Happen("pull " + std::to_string(bay));
         Happen("plug " + std::to_string(bay) + " --blank " + std::to_string(mib));
     }
+}
+
+// As when the kernel finds that a member does not answer.
+inline void FailMember(const std::string &array, const std::string &member)
+{
+    Told("echo faulty >/sys/block/" + array.substr(5) + "/md/dev-" + member.substr(5) + "/state");
 }
 
 inline std::string Disk(int bay)

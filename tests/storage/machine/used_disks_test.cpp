@@ -27,14 +27,12 @@ void Partition(int bay)
 
 void MakeVolume()
 {
-    ASSERT_EQ(LVMCreate(test::MakeList({"/dev/md2"}).get(), "/dev/vg1", "lv", nullptr, 0), 0);
-    Told("mkfs.ext4 -q -F /dev/vg1/lv && mount /dev/vg1/lv /mnt && dd if=/dev/urandom of=/mnt/data bs=64k count=64 && "
-         "sync");
+    Told("tavoctl volume create --yes 1 md2 && dd if=/dev/urandom of=/volume1/data bs=64k count=64 && sync");
 }
 
 void DropVolume()
 {
-    Told("umount /mnt");
+    Told("umount /volume1");
     EXPECT_EQ(LVMRemove("/dev/vg1", "lv"), 0);
     EXPECT_EQ(LVMVgRemove("/dev/vg1"), 0);
     EXPECT_EQ(LVMPvRemove("/dev/md2"), 0);
@@ -71,10 +69,10 @@ TEST_F(MachineUsedDisks, ADiskInUseIsNotHalfCleaned)
     EXPECT_EQ(Told("head -c 512 /dev/sda | sha256sum; ls /sys/block/sda | grep sda"), table);
     EXPECT_EQ(StatusOf("/dev/md0"), RAID_STATUS_NORMAL);
     // The system's array does not hinder the data partition; a file system on it does.
-    Told("mkfs.ext4 -q -F /dev/sda3 && mount /dev/sda3 /mnt");
+    Told("tavoctl volume create --yes 1 sda3");
     EXPECT_EQ(PartitionClean("/dev/sda", PARTITION_DATA), -1);
     EXPECT_EQ(Told("head -c 512 /dev/sda | sha256sum; ls /sys/block/sda | grep sda"), table);
-    Told("umount /mnt");
+    Told("tavoctl volume unmount 1");
     EXPECT_EQ(PartitionClean("/dev/sda", PARTITION_DATA), 0);
     EXPECT_EQ(PartitionCreate("/dev/sda", PARTITION_DATA, nullptr), 0);
     EXPECT_EQ(StatusOf("/dev/md0"), RAID_STATUS_NORMAL);
@@ -100,7 +98,7 @@ TEST_F(MachineUsedDisks, NoOldArrayComesBackAfterCleaning)
         EXPECT_EQ(PartitionClean(test::Disk(bay).c_str(), PARTITION_SYSTEM | PARTITION_DATA), 0);
         Partition(bay);
     }
-    Shell("mdadm -A --scan");
+    EXPECT_EQ(Told("tavoctl raid assemble --all && tavoctl raid list --all --noheadings"), "");
     EXPECT_THAT(Told("cat /proc/mdstat"), testing::Not(HasSubstr("active")));
     for (const char *member : {"/dev/sda1", "/dev/sda2", "/dev/sda3", "/dev/sdb2"}) {
         RAIDSUPERBLOCK superblock;
@@ -126,10 +124,10 @@ TEST_F(MachineUsedDisks, APulledDiskIsReplacedInItsBay)
                     .sync = false}),
               0);
     MakeVolume();
-    const std::string sum = Told("sha256sum /mnt/data");
+    const std::string sum = Told("sha256sum /volume1/data");
 
     test::Happen("pull 4");
-    Told("dd if=/dev/urandom of=/mnt/more bs=64k count=16 && sync");
+    Told("dd if=/dev/urandom of=/volume1/more bs=64k count=16 && sync");
     ASSERT_TRUE(test::Eventually([] { return StatusOf("/dev/md2") == RAID_STATUS_DEGRADED; }));
     EXPECT_THAT(MembersOf("/dev/md2", RAID_MEMBER_FAILED), ElementsAre("/dev/sdd3"));
     uint64_t kib = 0;
@@ -150,7 +148,7 @@ TEST_F(MachineUsedDisks, APulledDiskIsReplacedInItsBay)
     EXPECT_THAT(MembersOf("/dev/md2", RAID_MEMBER_ACTIVE),
                 UnorderedElementsAre("/dev/sda3", "/dev/sdb3", "/dev/sdc3", "/dev/sdd3"));
     Told("echo 3 >/proc/sys/vm/drop_caches");
-    EXPECT_EQ(Told("sha256sum /mnt/data"), sum);
+    EXPECT_EQ(Told("sha256sum /volume1/data"), sum);
 }
 
 TEST_F(MachineUsedDisks, AReplacementThatIsTooSmallChangesNothing)
@@ -224,9 +222,8 @@ TEST_F(MachineUsedDisks, SomebodysStickStaysAsItIs)
                                    "case $(readlink -f $block) in */usb*) echo -n /dev/${block##*/};; esac; done");
     ASSERT_THAT(stick, testing::StartsWith("/dev/sd"));
     // A group that is not active, over nothing but the stick, and a stray physical volume on a disk.
-    Told("pvcreate -q -ff -y " + stick + " && vgcreate -q vg9 " + stick +
-         " && lvcreate -q -W n -l100%VG -n lv vg9 && " +
-         "mkfs.ext4 -q /dev/vg9/lv && vgchange -q -an vg9 && pvcreate -q -ff -y /dev/sdb && sync");
+    Told("tavoctl volume create --yes 9 " + stick + " && tavoctl volume unmount 9 && sync");
+    ASSERT_EQ(LVMPvCreate("/dev/sdb"), 0);
     const std::string before = Told("blockdev --flushbufs " + stick + "; sha256sum " + stick);
     EXPECT_EQ(LVMCleanIllegal(), 0);
     ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .sync = false}), 0)

@@ -21,7 +21,7 @@ class MachineTavoctl : public test::MachineTest {
     void TearDown() override
     {
         if (test::OnMachine())
-            Told("umount /mnt 2>/dev/null; swapoff -a; /usr/lib/tavo-machine/reset");
+            Told("umount /volume* 2>/dev/null; swapoff -a; /usr/lib/tavo-machine/reset");
     }
 };
 
@@ -106,11 +106,13 @@ TEST_F(MachineTavoctl, BringsADiskFromBlankToVolumeAndBack)
 
     Succeeds({"lvm", "create", "--yes", "vg1", "md2"});
     IsRefused({"raid", "stop", "--yes", "md2"}, "/dev/md2 belongs to the volume vg1-lv");
-    Told("mkfs.ext4 -q /dev/vg1/lv && mount /dev/vg1/lv /mnt");
-    EXPECT_EQ(Facts({"lvm", "list"}).at(0).at("use"), "/dev/vg1/lv is mounted on /mnt");
-    IsRefused({"lvm", "remove", "--yes", "vg1"}, "/dev/vg1/lv is mounted on /mnt");
+    Succeeds({"lvm", "remove", "--yes", "vg1"});
+    Succeeds({"volume", "create", "--yes", "1", "md2"});
+    EXPECT_EQ(Facts({"lvm", "list"}).at(0).at("use"), "/dev/vg1/lv is mounted on /volume1");
+    IsRefused({"lvm", "remove", "--yes", "vg1"}, "/dev/vg1/lv is mounted on /volume1");
     IsRefused({"raid", "remove", "--yes", "md2"}, "belongs to the volume");
-    Told("echo x >/mnt/file && umount /mnt");
+    Told("echo x >/volume1/file");
+    Succeeds({"volume", "unmount", "1"});
     Succeeds({"lvm", "rename", "vg1", "vg2"});
     Succeeds({"lvm", "expand", "vg2"});
     Succeeds({"lvm", "remove", "--yes", "vg2"});
@@ -143,7 +145,7 @@ TEST_F(MachineTavoctl, ShowsHowFarARebuildIs)
     Told("echo 200000 >/sys/block/md4/md/sync_speed_max");
     Succeeds({"raid", "wait", "--timeout", "120", "md4"});
 
-    Told("mdadm -q /dev/md4 --fail /dev/sdb");
+    Told("echo faulty >/sys/block/md4/md/dev-sdb/state");
     IsRefused({"raid", "remove", "--yes", "md4", "sda"}, "is in sync");
     Succeeds({"raid", "remove", "--yes", "md4", "sdb"});
     EXPECT_EQ(Facts({"raid", "info", "md4"}).at("active"), json({"/dev/sda"}));
