@@ -29,6 +29,7 @@ FAULT = re.compile(r'Kernel panic|Oops|BUG:|kernel BUG at|Internal error:|Unable
 
 
 STICK = 99  # its number among the emulator's files: beyond all bays
+LOG = 100  # and those of logs are this one and the bay's
 
 
 class Died(Exception):
@@ -138,12 +139,14 @@ class _Monitor:
 class Machine:
     """with Machine(...) as machine: outcome = machine.run([...])"""
 
-    def __init__(self, image, hardware=Hardware(), share=None, cold=False, deadline=None, kept=(), own_programs=True):
+    def __init__(self, image, hardware=Hardware(), share=None, cold=False, deadline=None, kept=(), own_programs=True,
+                 above=None):
         self.image, self.hardware, self.deadline = image, hardware, deadline
         self.share = os.path.realpath(share) if share else None
         self.kept = list(kept)
         self.own_programs = own_programs  # this tree's, over the root
-        self.cold = cold or bool(self.kept)  # a saved machine remembers what was on its disks
+        self.above = above or {}  # of some bays: the emulator's filter over the disk, see _filter()
+        self.cold = cold or bool(self.kept or self.above)  # a saved machine remembers what was on its disks
         self.console = b''
         self.console_to = None  # where an interactive console goes
         self.tick = None
@@ -235,10 +238,14 @@ class Machine:
                 disk.truncate(hardware.size << 20)
             self.disks.append(disk)
             inherited.append(disk.fileno())
+            filtered = bay in self.above
             command += ['-add-fd', f'fd={disk.fileno()},set={bay}', '-blockdev',
-                        f'driver=raw,node-name=disk{bay},discard=unmap,cache.no-flush=on,file.driver=file,'
-                        f'file.filename=/dev/fdset/{bay},file.locking=off,file.discard=unmap',
-                        '-device', json.dumps(self._bay(bay))]
+                        f'driver=raw,node-name={"file" if filtered else "disk"}{bay},discard=unmap,'
+                        f'cache.no-flush={"off" if filtered else "on"},file.driver=file,'
+                        f'file.filename=/dev/fdset/{bay},file.locking=off,file.discard=unmap']
+            if filtered:
+                command += self._filter(bay, dict(self.above[bay]), inherited)
+            command += ['-device', json.dumps(self._bay(bay))]
         # What "plug usb" plugs in.
         self.stick = tempfile.TemporaryFile(prefix='tavo-disk.')
         self.stick.truncate(hardware.size << 20)
@@ -262,6 +269,27 @@ class Machine:
             self.lines[name].setblocking(True)
             self.selector.register(self.lines[name], selectors.EVENT_READ, name)
         self.received = {'agent': b'', 'events': b''}
+
+    def _filter(self, bay, node, inherited):
+        """What the emulator has between a drive and its file, by its driver: 'blkdebug' fails requests; 'throttle' may
+        stop answering, see stall(); 'blklogwrites' writes what comes in into the open file 'log'."""
+        words = []
+        if node['driver'] == 'throttle':
+            node['throttle-group'] = f'pace{bay}'
+            words += ['-object', json.dumps({'qom-type': 'throttle-group', 'id': f'pace{bay}', 'limits': {}})]
+        if node['driver'] == 'blklogwrites':
+            log = node['log']
+            inherited.append(log.fileno())
+            words += ['-add-fd', f'fd={log.fileno()},set={LOG + bay}', '-blockdev',
+                      f'driver=raw,node-name=log{bay},file.driver=file,file.filename=/dev/fdset/{LOG + bay},'
+                      'file.locking=off']
+            node['log'] = f'log{bay}'
+        node['image' if node['driver'] == 'blkdebug' else 'file'] = f'file{bay}'
+        return [*words, '-blockdev', json.dumps({'node-name': f'disk{bay}', **node})]
+
+    def stall(self, bay, stalled=True):
+        """Has a drive with the filter 'throttle' stop answering, or go on."""
+        self.monitor('qom-set', path=f'/objects/pace{bay}', property='limits', value={'bps-total': 1 if stalled else 0})
 
     def _bay(self, bay):
         if self.hardware.bus == 'sata':
