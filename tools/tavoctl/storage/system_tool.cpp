@@ -9,6 +9,7 @@
 
 #include <fcntl.h>
 #include <spawn.h>
+#include <sys/mman.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -25,8 +26,9 @@ std::string ToolResult::Reason() const
 
 ToolResult TryTool(const std::vector<std::string> &words)
 {
-    int ends[2];
-    if (::pipe2(ends, O_CLOEXEC) != 0)
+    // Not a pipe: what mdadm leaves running in the background would keep it open.
+    const int output = ::memfd_create("output", MFD_CLOEXEC);
+    if (output < 0)
         throw SystemFailure("run " + words[0], errno);
     std::vector<char *> arguments;
     for (const std::string &word : words)
@@ -38,25 +40,21 @@ ToolResult TryTool(const std::vector<std::string> &words)
     posix_spawn_file_actions_t streams;
     ::posix_spawn_file_actions_init(&streams);
     ::posix_spawn_file_actions_addopen(&streams, STDIN_FILENO, "/dev/null", O_RDONLY, 0);
-    ::posix_spawn_file_actions_adddup2(&streams, ends[1], STDOUT_FILENO);
-    ::posix_spawn_file_actions_adddup2(&streams, ends[1], STDERR_FILENO);
+    ::posix_spawn_file_actions_adddup2(&streams, output, STDOUT_FILENO);
+    ::posix_spawn_file_actions_adddup2(&streams, output, STDERR_FILENO);
     pid_t pid = 0;
     const int error = ::posix_spawn(&pid, words[0].c_str(), &streams, nullptr, arguments.data(), environment);
     ::posix_spawn_file_actions_destroy(&streams);
-    ::close(ends[1]);
     ToolResult result = {};
+    int status = 0;
+    while (error == 0 && ::waitpid(pid, &status, 0) < 0 && errno == EINTR)
+        ;
     char bytes[4096];
-    for (ssize_t count; error == 0 && (count = ::read(ends[0], bytes, sizeof bytes)) != 0;)
-        if (count > 0)
-            result.output.append(bytes, static_cast<std::size_t>(count));
-        else if (errno != EINTR)
-            break;
-    ::close(ends[0]);
+    for (ssize_t count; (count = ::pread(output, bytes, sizeof bytes, static_cast<off_t>(result.output.size()))) > 0;)
+        result.output.append(bytes, static_cast<std::size_t>(count));
+    ::close(output);
     if (error != 0)
         throw Failure{.attempted = "run " + words[0], .reason = std::strerror(error)};
-    int status = 0;
-    while (::waitpid(pid, &status, 0) < 0 && errno == EINTR)
-        ;
     result.status = WIFEXITED(status) ? WEXITSTATUS(status) : exit_by_signal + WTERMSIG(status);
     return result;
 }
