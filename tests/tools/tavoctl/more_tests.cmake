@@ -14,3 +14,9 @@ set_tests_properties(tavoctl_texts PROPERTIES TIMEOUT 120)
 add_test(NAME tavoctl_schemas COMMAND ${folder}/schemas $<TARGET_PROPERTY:tavoctl_schemas,FOLDER_OF_SCHEMAS>
     ${TAVO_ENTER} ${TAVO_ENTER_OPTIONS} --)
 set_tests_properties(tavoctl_schemas PROPERTIES TIMEOUT 300)
+
+# Disks that say that they sleep, for tavoctl and the tools that it runs in the virtual appliance.
+add_library(sleepy_drives MODULE ${folder}/preload/sleepy_drives.cpp)
+target_compile_options(sleepy_drives PRIVATE -U_TIME_BITS -U_FILE_OFFSET_BITS)
+target_compile_definitions(tools_tavoctl_test PRIVATE TEST_SLEEPY_DRIVES="$<TARGET_FILE:sleepy_drives>")
+add_dependencies(tools_tavoctl_test sleepy_drives)
