@@ -25,7 +25,9 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 
-using MachineArrays = test::StorageTest;
+using MachineArrays = test::LivedTest;
+
+INSTANTIATE_TEST_SUITE_P(, MachineArrays, testing::ValuesIn(test::Lives()), test::LifeName);
 
 std::vector<std::string> Partitions(int number, int first = 1, int last = 6)
 {
@@ -55,7 +57,7 @@ void Touch(const std::string &array, int mib = 0)
 }
 
 // From blank disks to arrays, through the loss of two disks, and back to nothing.
-TEST_F(MachineArrays, ALifeOfSixDisks)
+TEST_P(MachineArrays, ALifeOfSixDisks)
 {
     test::PlugLargeDisks(6, 4736);
     for (int bay = 1; bay <= 6; ++bay) {
@@ -116,9 +118,9 @@ TEST_F(MachineArrays, ALifeOfSixDisks)
     EXPECT_TRUE(test::Eventually([] { return RAIDStop("/dev/md2") == 0; }));
     Touch("/dev/md1");
     for (const char *number : {"1", "2"}) {
-        const Array array = ReadArray(std::string("/dev/md") + (number[0] == '1' ? "0" : "1"));
+        const Array holder = ReadArray(std::string("/dev/md") + (number[0] == '1' ? "0" : "1"));
         for (const char *disk : {"/dev/sdb", "/dev/sdc"})
-            EXPECT_EQ(RAIDRemoveDisk(array.get(), (std::string(disk) + number).c_str()), 0);
+            EXPECT_EQ(RAIDRemoveDisk(holder.get(), (std::string(disk) + number).c_str()), 0);
     }
     test::Happen("plug 2");
     test::Happen("plug 3");
@@ -141,7 +143,7 @@ TEST_F(MachineArrays, ALifeOfSixDisks)
         EXPECT_FALSE(HasSuperblock(member)) << member;
 }
 
-TEST_F(MachineArrays, EveryLevelIsMadeReadAndRemoved)
+TEST_P(MachineArrays, EveryLevelIsMadeReadAndRemoved)
 {
     const struct {
         int level;
@@ -188,7 +190,7 @@ TEST_F(MachineArrays, EveryLevelIsMadeReadAndRemoved)
     }
 }
 
-TEST_F(MachineArrays, MembersFailAreRemovedAndReplaced)
+TEST_P(MachineArrays, MembersFailAreRemovedAndReplaced)
 {
     ASSERT_EQ(Make({.path = "/dev/md3", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .sync = false}), 0);
     const Array array = ReadArray("/dev/md3");
@@ -221,7 +223,7 @@ TEST_F(MachineArrays, MembersFailAreRemovedAndReplaced)
     Told("losetup -d /dev/loop0");
 }
 
-TEST_F(MachineArrays, StoppedArraysAreAssembledAgain)
+TEST_P(MachineArrays, StoppedArraysAreAssembledAgain)
 {
     ASSERT_EQ(Make({.path = "/dev/md4", .level = RAID_LEVEL_5, .members = {"/dev/sdb", "/dev/sdc", "/dev/sdd"}}), 0);
     EXPECT_TRUE(BecomesNormal("/dev/md4"));
@@ -245,7 +247,7 @@ TEST_F(MachineArrays, StoppedArraysAreAssembledAgain)
     EXPECT_EQ(Told("head -c 4M /dev/md4 | md5sum"), sum);
 }
 
-TEST_F(MachineArrays, Raid5BecomesRaid6)
+TEST_P(MachineArrays, Raid5BecomesRaid6)
 {
     ASSERT_EQ(Make({.path = "/dev/md2",
                     .level = RAID_LEVEL_5,
@@ -270,7 +272,7 @@ TEST_F(MachineArrays, Raid5BecomesRaid6)
     EXPECT_EQ(RAIDMigrate2RAID6(ReadArray("/dev/md2").get(), test::MakeList({"/dev/sde"}).get()), -1);
 }
 
-TEST_F(MachineArrays, RoomOnTheMembersIsSeen)
+TEST_P(MachineArrays, RoomOnTheMembersIsSeen)
 {
     ASSERT_EQ(
         Make(
@@ -286,7 +288,7 @@ TEST_F(MachineArrays, RoomOnTheMembersIsSeen)
     EXPECT_GT(ReadArray("/dev/md2")->cbArray, 90u << 20);
 }
 
-TEST_F(MachineArrays, EnumeratesWhatRuns)
+TEST_P(MachineArrays, EnumeratesWhatRuns)
 {
     EXPECT_EQ(Make({.path = "/dev/md9", .level = RAID_LEVEL_0, .members = {"/dev/sda", "/dev/sdb"}}), 0);
     EXPECT_EQ(Make({.path = "/dev/md10", .level = RAID_LEVEL_LINEAR, .members = {"/dev/sdc", "/dev/sdd"}}), 0);

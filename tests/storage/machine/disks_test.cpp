@@ -22,7 +22,9 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::StartsWith;
 
-using MachineDisks = test::StorageTest;
+using MachineDisks = test::LivedTest;
+
+INSTANTIATE_TEST_SUITE_P(, MachineDisks, testing::ValuesIn(test::Lives()), test::LifeName);
 
 constexpr uint64_t disk_bytes = 96u << 20;
 
@@ -37,7 +39,7 @@ std::vector<std::string> Enumerated()
     return paths;
 }
 
-TEST_F(MachineDisks, AreEnumeratedInTheOrderOfTheirBays)
+TEST_P(MachineDisks, AreEnumeratedInTheOrderOfTheirBays)
 {
     DISKLIST *list = nullptr;
     ASSERT_EQ(DiskInfoEnum(nullptr, &list), 6);
@@ -57,7 +59,7 @@ TEST_F(MachineDisks, AreEnumeratedInTheOrderOfTheirBays)
     DiskInfoEnumFree(list);
 }
 
-TEST_F(MachineDisks, ReportsAnEmptyBayWithoutFailure)
+TEST_P(MachineDisks, ReportsAnEmptyBayWithoutFailure)
 {
     test::Happen("pull 3");
     {
@@ -70,7 +72,7 @@ TEST_F(MachineDisks, ReportsAnEmptyBayWithoutFailure)
     EXPECT_EQ(DiskIsExist("/dev/sdc"), 1);
 }
 
-TEST_F(MachineDisks, NumbersAndSummariesAgreeWithTheKernel)
+TEST_P(MachineDisks, NumbersAndSummariesAgreeWithTheKernel)
 {
     int32_t *numbers = nullptr;
     const int count = TAVODiskEnum(1, &numbers);
@@ -92,7 +94,7 @@ TEST_F(MachineDisks, NumbersAndSummariesAgreeWithTheKernel)
 }
 
 // The way through SG_IO must give what the way through HDIO_DRIVE_CMD gives, and that is what the real tools say.
-TEST_F(MachineDisks, BothCommandInterfacesReachTheDrive)
+TEST_P(MachineDisks, BothCommandInterfacesReachTheDrive)
 {
     const int fd = TAVOIDiskRawOpen("/dev/sdb");
     ASSERT_GE(fd, 0);
@@ -129,7 +131,7 @@ TEST_F(MachineDisks, BothCommandInterfacesReachTheDrive)
     ::close(fd);
 }
 
-TEST_F(MachineDisks, SmartPageIsWhatTheRealToolReads)
+TEST_P(MachineDisks, SmartPageIsWhatTheRealToolReads)
 {
     unsigned char page[512] = {};
     ASSERT_EQ(SmartDataRead("/dev/sda", page, 1), 0);
@@ -143,7 +145,7 @@ TEST_F(MachineDisks, SmartPageIsWhatTheRealToolReads)
     EXPECT_EQ(TAVODiskTemperatureGet("/dev/sda"), -1);
 }
 
-TEST_F(MachineDisks, WriteCacheGoesOffAndOn)
+TEST_P(MachineDisks, WriteCacheGoesOffAndOn)
 {
     for (const int wanted : {0, 1, 1, 0, 1}) {
         EXPECT_EQ(TAVODiskWriteCacheSet("/dev/sdc", wanted), 0);
@@ -152,7 +154,7 @@ TEST_F(MachineDisks, WriteCacheGoesOffAndOn)
     }
 }
 
-TEST_F(MachineDisks, PowerIsAskedAndChanged)
+TEST_P(MachineDisks, PowerIsAskedAndChanged)
 {
     unsigned char state = 0;
     EXPECT_EQ(TAVOIDiskCheckPower("/dev/sda", &state), 0);
@@ -174,7 +176,7 @@ TEST_F(MachineDisks, PowerIsAskedAndChanged)
     EXPECT_EQ(TLIBErrGet(), ERR_OPEN_RAWDEVICE);
 }
 
-TEST_F(MachineDisks, RecognisesAStickWithoutATable)
+TEST_P(MachineDisks, RecognisesAStickWithoutATable)
 {
     EXPECT_EQ(TAVOIsUSBDiskFATNoPartition("/dev/sdd"), 0);
     // The first sector of a FAT16 file system.

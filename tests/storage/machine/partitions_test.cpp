@@ -14,7 +14,9 @@ namespace {
 
 using test::Told;
 
-using MachinePartitions = test::StorageTest;
+using MachinePartitions = test::LivedTest;
+
+INSTANTIATE_TEST_SUITE_P(, MachinePartitions, testing::ValuesIn(test::Lives()), test::LifeName);
 
 constexpr int whole_layout = 4800;  // MiB; a version 7 needs 4608 before its data partition
 
@@ -66,7 +68,7 @@ int VersionOf(const std::string &disk, int raid)
     return BlTAVOCheckPartitionLayout(disk.c_str(), raid, &version) == 1 ? version : 0;
 }
 
-TEST_F(MachinePartitions, EveryLayoutIsMadeAndRecognised)
+TEST_P(MachinePartitions, EveryLayoutIsMadeAndRecognised)
 {
     test::PlugLargeDisks(1, whole_layout);
     const int64_t sectors = KernelSays("sda/size");
@@ -101,7 +103,7 @@ TEST_F(MachinePartitions, EveryLayoutIsMadeAndRecognised)
 }
 
 // Disks that an older appliance has made: their sectors, by the numbers of those days.
-TEST_F(MachinePartitions, DisksOfOldAppliancesAreRecognised)
+TEST_P(MachinePartitions, DisksOfOldAppliancesAreRecognised)
 {
     test::PlugLargeDisks(1, whole_layout);
     const struct {
@@ -141,7 +143,7 @@ TEST_F(MachinePartitions, DisksOfOldAppliancesAreRecognised)
     }
 }
 
-TEST_F(MachinePartitions, CleaningLeavesWhatItShould)
+TEST_P(MachinePartitions, CleaningLeavesWhatItShould)
 {
     test::PlugLargeDisks(1, whole_layout);
     ASSERT_EQ(PartitionCreate("/dev/sda", PARTITION_SYSTEM, nullptr), 0);

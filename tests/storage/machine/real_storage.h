@@ -1,4 +1,4 @@
-// What tests on the machine's own disks share. After each case the machine is as it was: no arrays or volumes, disks empty.
+// What tests on the machine's own disks share: disks that are blank, or had a life. After each case the machine is as it was: no arrays or volumes, disks empty.
 #ifndef TESTS_STORAGE_MACHINE_REAL_STORAGE_H
 #define TESTS_STORAGE_MACHINE_REAL_STORAGE_H
 
@@ -11,13 +11,36 @@
 #include "tavo_partition.h"
 #include "tavo_raid.h"
 
+#include <algorithm>
+#include <cstdlib>
+#include <iterator>
 #include <memory>
+#include <numeric>
 #include <string>
 #include <vector>
 
 #include <unistd.h>
 
 namespace test {
+
+// What disks held before a case. Each case runs on blank disks and on used ones: of one kind, chosen by the name of the case,
+// with TAVO_LONG_TESTS of every kind.
+inline constexpr const char *kLives[] = {"volume", "superblocks", "lvm", "guid_table", "file_system"};
+
+inline std::vector<std::string> Lives()
+{
+    std::vector<std::string> lives = {"blank"};
+    if (std::getenv("TAVO_LONG_TESTS"))
+        lives.insert(lives.end(), std::begin(kLives), std::end(kLives));
+    else
+        lives.emplace_back("used");
+    return lives;
+}
+
+inline std::string current_life = "blank";
+
+// Has the disks in bays 1 to count live.
+void LiveOn(int count);
 
 class StorageTest : public MachineTest {
   protected:
@@ -29,6 +52,34 @@ class StorageTest : public MachineTest {
         Told("/usr/lib/tavo-machine/reset; rm -rf /dev/vg* /volume*");
     }
 };
+
+// A case of this one runs once for each of Lives().
+class LivedTest : public StorageTest, public testing::WithParamInterface<std::string> {
+  protected:
+    void SetUp() override
+    {
+        StorageTest::SetUp();
+        if (IsSkipped())
+            return;
+        const std::string name = testing::UnitTest::GetInstance()->current_test_info()->name();
+        current_life = GetParam();
+        if (current_life == "used")
+            current_life = kLives[std::accumulate(name.begin(), name.end(), 0u) % std::size(kLives)];
+        RecordProperty("life", current_life);
+        LiveOn(6);
+    }
+
+    void TearDown() override
+    {
+        current_life = "blank";
+        StorageTest::TearDown();
+    }
+};
+
+inline std::string LifeName(const testing::TestParamInfo<std::string> &info)
+{
+    return info.param;
+}
 
 using Array = std::unique_ptr<RAIDINFO, decltype(&RAIDInfoFree)>;
 
@@ -91,13 +142,14 @@ inline bool BecomesNormal(const std::string &path)
     });
 }
 
-// The disks in bays 1 to count, replaced by empty ones of that size.
+// The disks in bays 1 to count, replaced by others of that size.
 inline void PlugLargeDisks(int count, int mib)
 {
     for (int bay = 1; bay <= count; ++bay) {
         Happen("pull " + std::to_string(bay));
         Happen("plug " + std::to_string(bay) + " --blank " + std::to_string(mib));
     }
+    LiveOn(count);
 }
 
 // As when the kernel finds that a member does not answer.
@@ -109,6 +161,55 @@ inline void FailMember(const std::string &array, const std::string &member)
 inline std::string Disk(int bay)
 {
     return std::string("/dev/sd") + static_cast<char>('a' + bay - 1);
+}
+
+inline void LiveOn(int count)
+{
+    if (current_life == "blank")
+        return;
+    SCOPED_TRACE("disks that held: " + current_life);
+    std::vector<std::string> disks;
+    std::string names;
+    for (int bay = 1; bay <= count; ++bay) {
+        disks.push_back(Disk(bay));
+        names += " " + Disk(bay);
+    }
+    if (current_life == "volume") {
+        // As the case makes them: an array and a group of the same names.
+        const bool system = Told("cat /sys/block/sda/size").size() > 7;  // room for the system's partitions
+        if (system) {
+            Told("tavoctl partition create --yes" + names);
+            for (std::string &disk : disks)
+                disk += "3";
+        }
+        ASSERT_EQ(Make({.path = "/dev/md2",
+                        .level = count > 2 ? RAID_LEVEL_5 : RAID_LEVEL_1,
+                        .members = disks,
+                        .slots = std::max(count, 2),
+                        .mib = 64,
+                        .sync = false}),
+                  0);
+        Told("tavoctl volume create --yes 1 md2 && date >/volume1/old && tavoctl volume unmount 1 && "
+             "rmdir /volume1 && tavoctl raid stop --yes md2");
+    } else if (current_life == "superblocks") {
+        ASSERT_EQ(Make({.path = "/dev/md7",
+                        .level = RAID_LEVEL_1,
+                        .members = disks,
+                        .slots = std::max(count, 2),
+                        .mib = 32,
+                        .sync = false}),
+                  0);
+        ASSERT_EQ(RAIDStop("/dev/md7"), 0);
+    } else if (current_life == "lvm") {
+        Told("pvcreate -q -ff -y" + names + " && vgcreate -q foreign" + names +
+             " && lvcreate -q -W n -l50%VG -n data foreign && vgchange -q -an foreign");
+    } else if (current_life == "guid_table") {
+        for (const std::string &disk : disks)
+            Told("printf 'g\\nn\\n\\n\\n\\nw\\n' | fdisk " + disk);
+    } else {
+        for (const std::string &disk : disks)
+            Told("mkfs.ext4 -q -F " + disk);
+    }
 }
 
 }  // namespace test

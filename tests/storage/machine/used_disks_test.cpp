@@ -1,6 +1,8 @@
 // Real disks that had a life: a volume was on them, they were pulled, they are large, they are somebody else's.
 #include "real_storage.h"
 
+#include "support/captured_log.h"
+
 #include <gmock/gmock.h>
 
 namespace {
@@ -16,7 +18,9 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::UnorderedElementsAre;
 
-using MachineUsedDisks = test::StorageTest;
+using MachineUsedDisks = test::LivedTest;
+
+INSTANTIATE_TEST_SUITE_P(, MachineUsedDisks, testing::ValuesIn(test::Lives()), test::LifeName);
 
 void Partition(int bay)
 {
@@ -38,7 +42,7 @@ void DropVolume()
     EXPECT_EQ(LVMPvRemove("/dev/md2"), 0);
 }
 
-TEST_F(MachineUsedDisks, AVolumeIsMadeWhereOneWasBefore)
+TEST_P(MachineUsedDisks, AVolumeIsMadeWhereOneWasBefore)
 {
     const std::vector<std::string> members = {"/dev/sda", "/dev/sdb", "/dev/sdc"};
     ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_5, .members = members, .sync = false}), 0);
@@ -52,7 +56,7 @@ TEST_F(MachineUsedDisks, AVolumeIsMadeWhereOneWasBefore)
     MakeVolume();
 }
 
-TEST_F(MachineUsedDisks, ADiskInUseIsNotHalfCleaned)
+TEST_P(MachineUsedDisks, ADiskInUseIsNotHalfCleaned)
 {
     test::PlugLargeDisks(2, 4800);
     Partition(1);
@@ -78,7 +82,7 @@ TEST_F(MachineUsedDisks, ADiskInUseIsNotHalfCleaned)
     EXPECT_EQ(StatusOf("/dev/md0"), RAID_STATUS_NORMAL);
 }
 
-TEST_F(MachineUsedDisks, NoOldArrayComesBackAfterCleaning)
+TEST_P(MachineUsedDisks, NoOldArrayComesBackAfterCleaning)
 {
     test::PlugLargeDisks(2, 4800);
     for (const int bay : {1, 2})
@@ -106,7 +110,7 @@ TEST_F(MachineUsedDisks, NoOldArrayComesBackAfterCleaning)
     }
 }
 
-TEST_F(MachineUsedDisks, APulledDiskIsReplacedInItsBay)
+TEST_P(MachineUsedDisks, APulledDiskIsReplacedInItsBay)
 {
     test::PlugLargeDisks(4, 4800);
     for (const int bay : {1, 2, 3, 4})
@@ -151,7 +155,7 @@ TEST_F(MachineUsedDisks, APulledDiskIsReplacedInItsBay)
     EXPECT_EQ(Told("sha256sum /volume1/data"), sum);
 }
 
-TEST_F(MachineUsedDisks, AReplacementThatIsTooSmallChangesNothing)
+TEST_P(MachineUsedDisks, AReplacementThatIsTooSmallChangesNothing)
 {
     ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .sync = false}), 0);
     test::Happen("pull 2");
@@ -163,7 +167,7 @@ TEST_F(MachineUsedDisks, AReplacementThatIsTooSmallChangesNothing)
     EXPECT_EQ(Told("cat /proc/mdstat"), before);
 }
 
-TEST_F(MachineUsedDisks, AnArrayStartsWithoutAMemberThatIsGone)
+TEST_P(MachineUsedDisks, AnArrayStartsWithoutAMemberThatIsGone)
 {
     const std::vector<std::string> members = {"/dev/sda", "/dev/sdb", "/dev/sdc", "/dev/sdd"};
     ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_5, .members = members, .sync = false}), 0);
@@ -186,7 +190,7 @@ TEST_F(MachineUsedDisks, AnArrayStartsWithoutAMemberThatIsGone)
     EXPECT_EQ(StatusOf("/dev/md2"), 0);
 }
 
-TEST_F(MachineUsedDisks, AllOfALargeDiskIsUsed)
+TEST_P(MachineUsedDisks, AllOfALargeDiskIsUsed)
 {
     constexpr int tib = 1 << 20;
     test::PlugLargeDisks(2, 3 * tib);
@@ -215,7 +219,45 @@ TEST_F(MachineUsedDisks, AllOfALargeDiskIsUsed)
     EXPECT_EQ(Told("ls /sys/block/sda | grep -c sda || true"), "0\n");
 }
 
-TEST_F(MachineUsedDisks, SomebodysStickStaysAsItIs)
+// Three disks of 8 TiB: the largest volume that fits, and one that this kernel could not reach.
+TEST_P(MachineUsedDisks, AVolumeOfFifteenTebibytes)
+{
+    constexpr int tib = 1 << 20;
+    test::PlugLargeDisks(3, 8 * tib);
+    for (const int bay : {1, 2, 3}) {
+        Partition(bay);
+        const std::string disk = test::Disk(bay).substr(5);
+        EXPECT_EQ(RCPartitionConfigs(3, disk.c_str(), nullptr, nullptr), (int64_t{16} << 30) - 33 - 9437184);
+    }
+    const std::vector<std::string> members = {"/dev/sda3", "/dev/sdb3", "/dev/sdc3"};
+    for (const int level : {RAID_LEVEL_0, RAID_LEVEL_LINEAR}) {
+        const test::CapturedLog log;
+        EXPECT_EQ(Make({.path = "/dev/md2", .level = level, .members = members, .sync = false}), -1);
+        EXPECT_THAT(log.Texts(), testing::Contains(HasSubstr("larger than the 16 TiB")));
+    }
+    for (const std::string &member : members) {
+        RAIDSUPERBLOCK superblock;
+        EXPECT_EQ(RAIDSBGet(member.c_str(), &superblock), 0) << member;
+    }
+    ASSERT_EQ(Make({.path = "/dev/md2",
+                    .level = RAID_LEVEL_5,
+                    .members = members,
+                    .mib = uint64_t{15} * tib / 2,
+                    .sync = false}),
+              0);
+    EXPECT_EQ(ReadArray("/dev/md2")->cbArray, uint64_t{15} << 40);
+    Told("tavoctl volume create --yes 1 md2");
+    EXPECT_GT(std::stoull(Told("stat -f -c %b /volume1")) * 4, uint64_t{14} << 30) << "KiB";
+    Told("tavoctl volume unmount 1 && tavoctl volume check 1 && tavoctl lvm remove --yes vg1");
+    // The last block is there, and is not the first one.
+    ASSERT_EQ(LVMCreate(test::MakeList({"/dev/md2"}).get(), "/dev/vg1", "lv", nullptr, 0), 0);
+    Told("lv=$(readlink -f /dev/vg1/lv) && last=$(($(blockdev --getsize64 $lv) / 4096 - 1)) && "
+         "head -c 4096 /dev/zero >/tmp/zero && head -c 4096 /dev/urandom >/tmp/random && "
+         "dd if=/tmp/zero of=$lv bs=4096 oflag=direct && dd if=/tmp/random of=$lv bs=4096 seek=$last oflag=direct && "
+         "dd if=$lv bs=4096 skip=$last iflag=direct | cmp - /tmp/random && dd if=$lv bs=4096 count=1 | cmp - /tmp/zero");
+}
+
+TEST_P(MachineUsedDisks, SomebodysStickStaysAsItIs)
 {
     test::Happen("plug usb --blank");
     const std::string stick = Told("for block in /sys/block/sd*; do "
@@ -236,7 +278,7 @@ TEST_F(MachineUsedDisks, SomebodysStickStaysAsItIs)
 }
 
 // Sectors of 4,096 bytes: every geometry of ours counts in 512.
-TEST_F(MachineUsedDisks, OtherSectorsAreRefusedBeforeAnythingIsWritten)
+TEST_P(MachineUsedDisks, OtherSectorsAreRefusedBeforeAnythingIsWritten)
 {
     Told("truncate -s 64M /tmp/image && losetup -b 4096 /dev/loop0 /tmp/image");
     const std::string before = Told("sha256sum /tmp/image");
