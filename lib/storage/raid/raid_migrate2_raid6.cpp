@@ -56,9 +56,9 @@ extern "C" int RAIDMigrate2RAID6(const RAIDINFO *pInfo, const TLIBSZLIST *pslMem
         if (IsUnfit(*pInfo, *pslMembers))
             return -1;
         const std::string beyond = tavo::ArrayBeyondReach(pInfo->szPath, {.level = RAID_LEVEL_6,
-                                                                           .slots = pslMembers->nItem - 1,
-                                                                           .member_limit = pInfo->cbMember,
-                                                                           .members = nullptr});
+                                                                          .slots = pslMembers->nItem - 1,
+                                                                          .member_limit = pInfo->cbMember,
+                                                                          .members = nullptr});
         if (!beyond.empty()) {
             LogError("%s:%d %s", beyond);
             return -1;

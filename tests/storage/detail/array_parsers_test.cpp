@@ -36,6 +36,10 @@ TEST(MdadmExamine, RealSuperblocks)
         {"mdadm_E_0.90-mdadm-4.2", "99a1cb1e:1aaa3c52:49268cdc:b4e6580a", "/dev/md1", 0, 90, 2, 2, 0, 18},
         {"mdadm_E_1.2-mdadm-4.2", "495e879a:4e806313:a484c744:9c844bd2", "/dev/md0", 1, 2, 2, 2, 0, 19},
         {"mdadm_E_1.2_raid5-mdadm-4.2", "b7e9ed0e:bf1ea758:5bf5fba6:7c359649", "/dev/md5", 1, 2, 4, 3, 0, 19},
+        {"mdadm_E_0.90-mdadm-4.4", "7f3ba539:4502fd79:c7780c0e:bc15422d", "/dev/md1", 0, 90, 2, 2, 0, 1},
+        {"mdadm_E_1.1-mdadm-4.4", "ec25d9d6:a7330043:4ae7249b:66581f6c", "/dev/md0", 1, 1, 2, 2, 0, 0},
+        {"mdadm_E_1.2_raid5-mdadm-4.4", "35dd76be:fd15b260:63ed28c1:35177f1d", "/dev/md5", 1, 2, 4, 3, 0, 18},
+        {"mdadm_E_1.2_raid5_spare-mdadm-4.4", "35dd76be:fd15b260:63ed28c1:35177f1d", "/dev/md5", 1, 2, 4, 3, -1, 18},
     };
     for (const auto &row : rows) {
         const RAIDSUPERBLOCK superblock = Examine(test::Capture(row.capture));
@@ -145,6 +149,26 @@ TEST(LvmLines, PhysicalVolumes)
     EXPECT_EQ(std::string(longest->szUuid).size(), 255u);
     for (std::string_view text = test::Capture("pvs_plain-lvm2-2.03"); !text.empty();)
         EXPECT_FALSE(tavo::ParsePvLine(tavo::TakeLine(text)));
+}
+
+TEST(LvmLines, OfTheNextRelease)
+{
+    std::string_view text = test::Capture("pvs-lvm2-2.03.31");
+    const auto alone = tavo::ParsePvLine(tavo::TakeLine(text));
+    const auto grouped = tavo::ParsePvLine(tavo::TakeLine(text));
+    ASSERT_TRUE(alone && grouped);
+    EXPECT_STREQ(alone->szPv, "/dev/md1");
+    EXPECT_STREQ(alone->szVg, "");
+    EXPECT_EQ(alone->nPv, 0);
+    EXPECT_STREQ(grouped->szPv, "/dev/md5");
+    EXPECT_STREQ(grouped->szVg, "/dev/vg1");
+    EXPECT_EQ(grouped->nPv, 1);
+    EXPECT_EQ(tavo::ParseVgLine(test::Capture("vgs-lvm2-2.03.31")), grouped->szUuid);
+    text = test::Capture("pvs_lv-lvm2-2.03.31");
+    EXPECT_FALSE(tavo::ParsePvVolumeLine(tavo::TakeLine(text))) << "in no group";
+    const auto volume = tavo::ParsePvVolumeLine(tavo::TakeLine(text));
+    ASSERT_TRUE(volume);
+    EXPECT_EQ(volume->device + volume->group + volume->volume, "/dev/md5vg1lv");
 }
 
 TEST(LvmLines, GroupsAndVolumes)

@@ -53,7 +53,8 @@ bool HasSuperblock(const std::string &member)
 // A disk that is gone is noticed when somebody writes.
 void Touch(const std::string &array, int mib = 0)
 {
-    Shell("dd if=/dev/urandom of=" + array + " bs=64k count=64 oflag=direct,seek_bytes seek=" + std::to_string(mib) + "M");
+    Shell("dd if=/dev/urandom of=" + array + " bs=64k count=64 oflag=direct,seek_bytes seek=" + std::to_string(mib) +
+          "M");
 }
 
 // From blank disks to arrays, through the loss of two disks, and back to nothing.

@@ -148,8 +148,9 @@ TEST_P(MachinePartitions, CleaningLeavesWhatItShould)
     test::PlugLargeDisks(1, whole_layout);
     ASSERT_EQ(PartitionCreate("/dev/sda", PARTITION_SYSTEM, nullptr), 0);
     ASSERT_EQ(PartitionCreate("/dev/sda", PARTITION_DATA, nullptr), 0);
-    ASSERT_EQ(test::Make({.path = "/dev/md9", .level = RAID_LEVEL_1, .members = {"/dev/sda3"}, .slots = 2, .sync = false}),
-              0);
+    ASSERT_EQ(
+        test::Make({.path = "/dev/md9", .level = RAID_LEVEL_1, .members = {"/dev/sda3"}, .slots = 2, .sync = false}),
+        0);
     ASSERT_EQ(RAIDStop("/dev/md9"), 0);
     RAIDSUPERBLOCK superblock;
     ASSERT_EQ(RAIDSBGet("/dev/sda3", &superblock), 1);

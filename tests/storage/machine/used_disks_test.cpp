@@ -251,10 +251,11 @@ TEST_P(MachineUsedDisks, AVolumeOfFifteenTebibytes)
     Told("tavoctl volume unmount 1 && tavoctl volume check 1 && tavoctl lvm remove --yes vg1");
     // The last block is there, and is not the first one.
     ASSERT_EQ(LVMCreate(test::MakeList({"/dev/md2"}).get(), "/dev/vg1", "lv", nullptr, 0), 0);
-    Told("lv=$(readlink -f /dev/vg1/lv) && last=$(($(blockdev --getsize64 $lv) / 4096 - 1)) && "
-         "head -c 4096 /dev/zero >/tmp/zero && head -c 4096 /dev/urandom >/tmp/random && "
-         "dd if=/tmp/zero of=$lv bs=4096 oflag=direct && dd if=/tmp/random of=$lv bs=4096 seek=$last oflag=direct && "
-         "dd if=$lv bs=4096 skip=$last iflag=direct | cmp - /tmp/random && dd if=$lv bs=4096 count=1 | cmp - /tmp/zero");
+    Told(
+        "lv=$(readlink -f /dev/vg1/lv) && last=$(($(blockdev --getsize64 $lv) / 4096 - 1)) && "
+        "head -c 4096 /dev/zero >/tmp/zero && head -c 4096 /dev/urandom >/tmp/random && "
+        "dd if=/tmp/zero of=$lv bs=4096 oflag=direct && dd if=/tmp/random of=$lv bs=4096 seek=$last oflag=direct && "
+        "dd if=$lv bs=4096 skip=$last iflag=direct | cmp - /tmp/random && dd if=$lv bs=4096 count=1 | cmp - /tmp/zero");
 }
 
 TEST_P(MachineUsedDisks, SomebodysStickStaysAsItIs)

@@ -110,7 +110,8 @@ TEST_P(MachineVolumes, ADevicesVolumeGoesWithItsMountedSnapshots)
     Told("lvcreate -q -W n -L 40M -n lv vg1 && mkfs.ext4 -q /dev/vg1/lv && lvcreate -q -s -L 8M -n lvs1 vg1/lv && "
          "mkdir -p /mnt/shot && mount -o ro,noload /dev/vg1/lvs1 /mnt/shot");
     // A device whose name begins with this one's, and a volume whose name does.
-    Told("lvcreate -q -W n -L 40M -n lvsecond vg2 && mkfs.ext4 -q /dev/vg2/lvsecond && mkdir -p /mnt/other && mount /dev/vg2/lvsecond /mnt/other");
+    Told("lvcreate -q -W n -L 40M -n lvsecond vg2 && mkfs.ext4 -q /dev/vg2/lvsecond && mkdir -p /mnt/other && mount "
+         "/dev/vg2/lvsecond /mnt/other");
     EXPECT_EQ(LVMRemoveLV("/dev/md2"), 0);
     EXPECT_THAT(PhysicalVolumes(), ElementsAre("/dev/md22 /dev/vg2"));
     EXPECT_THAT(Told("cat /proc/mounts"), Not(HasSubstr("/mnt/shot")));

@@ -109,24 +109,78 @@ TEST_F(Reach, NothingBeyondItIsMade)
         uint64_t largest;  // device that is taken
         std::function<int()> call;
     } rows[] = {
-        {"table", 16 * kTib, [] { return PartitionAddTable("/dev/sda"); }},
-        {"system", 16 * kTib, [&] { return PartitionCreate("/dev/sda", PARTITION_SYSTEM, &version); }},
-        {"data", 16 * kTib, [&] { return PartitionCreate("/dev/sda", PARTITION_DATA, &version); }},
-        {"clean", 16 * kTib, [] { return PartitionClean("/dev/sda", PARTITION_SYSTEM | PARTITION_DATA); }},
-        {"linear", 8 * kTib, [&] { return Create(RAID_LEVEL_LINEAR, {"/dev/sda3", "/dev/sdb3"}, 2); }},
-        {"RAID 0", 8 * kTib, [&] { return Create(RAID_LEVEL_0, {"/dev/sda3", "/dev/sdb3"}, 2); }},
-        {"RAID 1", 16 * kTib, [&] { return Create(RAID_LEVEL_1, {"/dev/sda3", "/dev/sdb3"}, 2); }},
-        {"a part of RAID 1", 16 * kTib, [&] { return Create(RAID_LEVEL_1, {"/dev/sda3", "/dev/sdb3"}, 2, kTib); }},
-        {"RAID 5", 8 * kTib, [&] { return Create(RAID_LEVEL_5, {"/dev/sda3", "/dev/sdb3", "/dev/sdc3"}, 3); }},
-        {"RAID 5, degraded", 4 * kTib, [&] { return Create(RAID_LEVEL_5, {"/dev/sda3", "/dev/sdb3"}, 5); }},
-        {"RAID 6", 8 * kTib, [&] { return Create(RAID_LEVEL_6, {"/dev/sda3", "/dev/sdb3"}, 4); }},
-        {"RAID 10", 8 * kTib, [&] { return Create(RAID_LEVEL_10, {"/dev/sda3", "/dev/sdb3"}, 4); }},
-        {"longer", 8 * kTib, [&] { return RAIDAdd(&linear, "/dev/sdb3"); }},
-        {"a member", 16 * kTib, [&] { return RAIDAdd(&raid5, "/dev/sdd3"); }},
-        {"volume", 16 * kTib, [] { return LVMPvCreate("/dev/md2"); }},
-        {"group", 8 * kTib, [&] { return LVMVgCreate("/dev/vg1", group.get()); }},
-        {"all of it", 8 * kTib, [&] { return LVMCreate(group.get(), "/dev/vg1", "lv", nullptr, 0); }},
-        {"grown", 8 * kTib, [&] { return LVMPvExpand(info); }},
+        {"table", 16 * kTib,
+         [] {
+             return PartitionAddTable("/dev/sda");
+         }},
+        {"system", 16 * kTib,
+         [&] {
+             return PartitionCreate("/dev/sda", PARTITION_SYSTEM, &version);
+         }},
+        {"data", 16 * kTib,
+         [&] {
+             return PartitionCreate("/dev/sda", PARTITION_DATA, &version);
+         }},
+        {"clean", 16 * kTib,
+         [] {
+             return PartitionClean("/dev/sda", PARTITION_SYSTEM | PARTITION_DATA);
+         }},
+        {"linear", 8 * kTib,
+         [&] {
+             return Create(RAID_LEVEL_LINEAR, {"/dev/sda3", "/dev/sdb3"}, 2);
+         }},
+        {"RAID 0", 8 * kTib,
+         [&] {
+             return Create(RAID_LEVEL_0, {"/dev/sda3", "/dev/sdb3"}, 2);
+         }},
+        {"RAID 1", 16 * kTib,
+         [&] {
+             return Create(RAID_LEVEL_1, {"/dev/sda3", "/dev/sdb3"}, 2);
+         }},
+        {"a part of RAID 1", 16 * kTib,
+         [&] {
+             return Create(RAID_LEVEL_1, {"/dev/sda3", "/dev/sdb3"}, 2, kTib);
+         }},
+        {"RAID 5", 8 * kTib,
+         [&] {
+             return Create(RAID_LEVEL_5, {"/dev/sda3", "/dev/sdb3", "/dev/sdc3"}, 3);
+         }},
+        {"RAID 5, degraded", 4 * kTib,
+         [&] {
+             return Create(RAID_LEVEL_5, {"/dev/sda3", "/dev/sdb3"}, 5);
+         }},
+        {"RAID 6", 8 * kTib,
+         [&] {
+             return Create(RAID_LEVEL_6, {"/dev/sda3", "/dev/sdb3"}, 4);
+         }},
+        {"RAID 10", 8 * kTib,
+         [&] {
+             return Create(RAID_LEVEL_10, {"/dev/sda3", "/dev/sdb3"}, 4);
+         }},
+        {"longer", 8 * kTib,
+         [&] {
+             return RAIDAdd(&linear, "/dev/sdb3");
+         }},
+        {"a member", 16 * kTib,
+         [&] {
+             return RAIDAdd(&raid5, "/dev/sdd3");
+         }},
+        {"volume", 16 * kTib,
+         [] {
+             return LVMPvCreate("/dev/md2");
+         }},
+        {"group", 8 * kTib,
+         [&] {
+             return LVMVgCreate("/dev/vg1", group.get());
+         }},
+        {"all of it", 8 * kTib,
+         [&] {
+             return LVMCreate(group.get(), "/dev/vg1", "lv", nullptr, 0);
+         }},
+        {"grown", 8 * kTib,
+         [&] {
+             return LVMPvExpand(info);
+         }},
     };
     for (const auto &row : rows) {
         SCOPED_TRACE(row.what);

@@ -47,17 +47,16 @@ TEST_F(MachineSleep, ListsAskSleepingDisksForNothingButTheirPower)
     Succeeds({"volume", "create", "--yes", "1", "md2"});
     Told("sync; sleep 8; sync");  // what the file system still had to write
     const std::set<std::string> power = {"E5"};
-    for (const char *words : {"disk list", "disk list --json", "disk info sda", "disk health", "raid list", "raid info md2",
-                              "raid list --all", "storage", "partition list", "partition layout sda", "volume list",
-                              "lvm list", "disk smart sda", "disk temperature sda"}) {
+    for (const char *words : {"disk list", "disk list --json", "disk info sda", "disk health", "raid list",
+                              "raid info md2", "raid list --all", "storage", "partition list", "partition layout sda",
+                              "volume list", "lvm list", "disk smart sda", "disk temperature sda"}) {
         std::remove("/tmp/asked");
         Told("echo 3 >/proc/sys/vm/drop_caches");
         const std::string before = Traffic();
         const test::CommandResult result =
             Shell(std::string("LD_PRELOAD=" TEST_SLEEPY_DRIVES " timeout 60 tavoctl ") + words);
         EXPECT_NE(result.status, 124) << words;
-        EXPECT_THAT(Asked(), testing::AnyOf(testing::Eq(power), testing::IsEmpty()))
-            << words << "\n" << result.output;
+        EXPECT_THAT(Asked(), testing::AnyOf(testing::Eq(power), testing::IsEmpty())) << words << "\n" << result.output;
         EXPECT_EQ(Traffic(), before) << words << "\n" << result.output;
     }
     // And it is not that nothing is ever written down.
