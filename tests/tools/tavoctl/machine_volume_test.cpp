@@ -117,6 +117,29 @@ TEST_F(MachineVolumes, ThreeCommandsFromBlankDisksToAVolumeThatOutlivesADisk)
     EXPECT_EQ(Told("sha256sum </volume1/data"), sum);
 }
 
+TEST_F(MachineVolumes, ADocumentOfTheStateBringsQuotasAndServicesOnce)
+{
+    Succeeds({"raid", "create", "--yes", "--level", "1", "--no-sync", "md2", "sda", "sdb"});
+    Succeeds({"volume", "create", "--yes", "1", "md2"});
+    Succeeds({"user", "add", "--unknown-password", "anna"});
+    const test::ScratchDir dir;
+    test::WriteFile(dir / "box.json",
+                    R"({"format_version": 1, "quotas": [{"volume": 1, "user": "anna", "limit_kib": 2048}],
+        "services": [{"name": "media", "enabled": true, "folders": ["/volume1/music"]}]})");
+    EXPECT_EQ(Facts({"state", "apply", "--json", dir / "box.json"}).at("changed"), true);
+    EXPECT_THAT(Facts({"state", "show", "--json"}).at("quotas"),
+                testing::Contains(json({{"volume", 1}, {"user", "anna"}, {"limit_kib", 2048}})));
+    EXPECT_EQ(Told("readlink /var/services/music"), "/volume1/music\n");
+    Told("mkdir -m 777 /volume1/open; su -s /bin/sh anna -c 'head -c 3M /dev/zero >/volume1/open/full' 2>/dev/null; "
+         "true");
+    EXPECT_LE(std::stol(Told("stat -c %s /volume1/open/full")), 2048 * 1024) << "the limit holds";
+    EXPECT_EQ(Facts({"state", "apply", "--json", dir / "box.json"}).at("changed"), false);
+    EXPECT_EQ(Facts({"state", "diff", "--json", dir / "box.json"}), json::array());
+    Succeeds({"service", "disable", "media"});
+    Told("quotaoff /volume1");
+    Succeeds({"user", "delete", "--yes", "anna"});
+}
+
 TEST_F(MachineVolumes, AVolumeGrowsWithItsArray)
 {
     Succeeds({"raid", "create", "--yes", "--level", "1", "--size", "40", "--no-sync", "md2", "sda", "sdb"});
