@@ -168,7 +168,9 @@ TEST(LvmLines, OfTheNextRelease)
     EXPECT_FALSE(tavo::ParsePvVolumeLine(tavo::TakeLine(text))) << "in no group";
     const auto volume = tavo::ParsePvVolumeLine(tavo::TakeLine(text));
     ASSERT_TRUE(volume);
-    EXPECT_EQ(volume->device + volume->group + volume->volume, "/dev/md5vg1lv");
+    EXPECT_EQ(volume->device, "/dev/md5");
+    EXPECT_EQ(volume->group, "vg1");
+    EXPECT_EQ(volume->volume, "lv");
 }
 
 TEST(LvmLines, GroupsAndVolumes)
