@@ -38,7 +38,7 @@ def declarations():
 def main(folder):
     folder.mkdir(parents=True, exist_ok=True)
     builder = cffi.FFI()
-    # Arrays that the library hands over are the caller's to free.
+    # The caller frees arrays that the library returns.
     builder.cdef(declarations() + "\nvoid free(void *);")
     builder.set_source("tavosdk._tavosdk", "#include <stdlib.h>\n#include <tavosdk.h>")
     builder.emit_c_code(str(folder / "_tavosdk.c"))

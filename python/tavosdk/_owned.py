@@ -1,4 +1,4 @@
-"""What the library hands over and the caller frees: blocks that an object owns, records that a call fills in."""
+"""Memory that the library returns and the caller frees: blocks that an object owns, records that a call fills in."""
 from __future__ import annotations
 
 import contextlib

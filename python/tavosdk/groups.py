@@ -13,7 +13,7 @@ __getattr__, __dir__ = c_names("group", globals())
 @dataclasses.dataclass
 class Group:
     name: str
-    gid: int = -1                   #: -1 when handed in: choose one, or keep it
+    gid: int = -1                   #: -1 when passed in: choose one, or keep it
     members: list[str] = dataclasses.field(default_factory=list)
     description: str = ""
 

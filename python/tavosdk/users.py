@@ -19,8 +19,8 @@ _EPOCH = datetime.date(1970, 1, 1)
 @dataclasses.dataclass
 class User:
     name: str
-    uid: int = -1                   #: -1 when handed in: choose one, or keep it
-    gid: int = -1                   #: primary group; -1 when handed in: 100
+    uid: int = -1                   #: -1 when passed in: choose one, or keep it
+    gid: int = -1                   #: primary group; -1 when passed in: 100
     description: str = ""
     home: str = ""
     shell: str = ""

@@ -1,4 +1,4 @@
-"""The tests of the module once more under the sanitizers' allocator: what the library hands over is freed.
+"""The tests of the module once more under the sanitizers' allocator: memory that the library returns is freed.
 
 Python itself keeps memory until it ends, so only blocks that libtavosdk asked for count.
 """

@@ -277,8 +277,8 @@ TEST(Bdb, RemovesForeignFiles)
     EXPECT_EQ(dir.Names(), (std::vector<std::string>{"outside"}));
 }
 
-// The database builds a new file as "__db.NAME" beside it; a killed process may have left one, or somebody put it
-// there.
+// The database builds a new file as "__db.NAME" beside it; a killed process may have left one, or another user
+// created it.
 TEST(Bdb, LeftoversOfACreationDoNotMatter)
 {
     const test::ScratchDir dir;

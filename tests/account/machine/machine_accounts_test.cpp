@@ -100,7 +100,7 @@ TEST_F(MachineAccounts, TheSystemsOwnToolsReadWhatTheLibraryWrites)
     EXPECT_THAT(Shell("chage -l " + std::string(juergen)).output, HasSubstr("Jan 31, 2037"));
     EXPECT_THAT(Shell("chage -l anna").output, testing::ContainsRegex("Account expires[^\n]*never"));
 
-    // Somebody who is not root becomes anna with her password, and not with another.
+    // A user other than root becomes anna with her password, and not with another.
     const std::string as_nobody = "setpriv --reuid 1023 --regid 1023 --clear-groups su anna -c 'id -un'";
     EXPECT_THAT(Shell("echo 'secret one' | " + as_nobody).output, HasSubstr("anna\n"));
     EXPECT_NE(Shell("echo 'secret two' | " + as_nobody).status, 0);

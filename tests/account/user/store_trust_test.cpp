@@ -97,7 +97,7 @@ TEST(StoreTrust, OwnersAndModes)
 }
 
 // Stores as the library once made them: everybody can write to them, also through a mapping of old.
-TEST(StoreTrust, WhatOthersMayWriteIsNeverOpened)
+TEST(StoreTrust, NeverOpensFilesThatOthersMayWrite)
 {
     ASSERT_EQ(test::AddUser({.name = "alice", .password = "x"}), 0);
     const std::string hash = test::GetUser("alice")->szPasswd;
@@ -179,7 +179,7 @@ TEST(StoreTrust, PlantedTreesBlockNoCall)
     ExpectOurs();
 }
 
-// What the attacker saw and did, in memory that outlives it.
+// The attacker's results, in memory that outlives its process.
 struct Loot {
     std::atomic<int> tries;
     std::atomic<int> secrets;  // files with a hash in them that it could read

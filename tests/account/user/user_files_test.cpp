@@ -1,4 +1,4 @@
-// What every change leaves in the four account files, to the byte.
+// The contents of the four account files after every change, to the byte.
 #include "tavo_user.h"
 
 #include "account/user/user_fixture.h"

@@ -37,7 +37,7 @@ struct Fault {
     int reason = 0;
 } fault;
 
-// What somebody else does at the next rename of the library's.
+// Another program's action at the library's next rename.
 std::function<void()> meanwhile;
 
 // And at the next wait for the disk, when the new files have been composed from what the old ones said.

@@ -434,7 +434,7 @@ TEST(UserFollowUp, FoldersListsAndServices)
     ASSERT_EQ(test::SetUser("carol", &changed), 0);
     EXPECT_EQ(test::ReadFile("/etc/rsyncd.secrets"), "other:secret\n");
 
-    // A renamed user never gets, or loses, a folder that is somebody else's.
+    // A renamed user never gets, or loses, the folder of another user.
     ASSERT_EQ(::mkdir("/volume1/homes/dave", 0700), 0);
     ASSERT_EQ(test::Rename("carol", "dave"), 0);
     EXPECT_EQ(test::ReadFile("/volume1/homes/carol/letter"), "mine\n");

@@ -107,7 +107,7 @@ TEST_F(Discovery, EachFailureIsABitAndTheOthersAreTried)
 }
 
 // A port without a cable is not a failure, and the ports after it keep their bits.
-TEST_F(Discovery, CardsWithoutAnAddressArePassedOver)
+TEST_F(Discovery, SkipsCardsWithoutAnAddress)
 {
     AddCard("eth0");
     WriteFile(test::kScripts + "ifcfg-eth0", "DEVICE=eth0\nBOOTPROTO=dhcp\nIPADDR=192.0.2.9\n");
@@ -162,7 +162,7 @@ TEST_F(Discovery, WithoutADaemonNothingIsCollected)
     EXPECT_THAT(sent, IsEmpty());
 }
 
-// Neither a name nor a pid file makes a daemon, and neither does a lock that somebody else has on the file.
+// Neither a name nor a pid file nor another user's lock on that file counts as a daemon.
 TEST_F(Discovery, OnlyTheLockOfThePidFileIsADaemon)
 {
     WriteFile("/usr/tavo/bin/findhostd", "#!/bin/sh\nexit 1\n", 0755);
@@ -240,7 +240,7 @@ TEST_F(Discovery, HostsAreHandedToACallbackAndTheListStays)
     EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
 }
 
-TEST_F(Discovery, TheListIsHandedOver)
+TEST_F(Discovery, MovesTheListToItsCaller)
 {
     const Daemon daemon;
     AddCard("eth0", "192.0.2.10");

@@ -159,7 +159,7 @@ TEST_F(Bond, TheRemainderOfAnOldCopyIsNotRestored)
     EXPECT_EQ(Files(), kBondFiles);
 }
 
-TEST_F(Bond, WhatCannotBeWrittenIsPutBack)
+TEST_F(Bond, RestoresAfterAFailedWrite)
 {
     for (int failing = 0; failing < 3; ++failing) {
         Plain();

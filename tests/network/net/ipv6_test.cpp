@@ -218,7 +218,7 @@ TEST_F(NetIPv6, WakeOnLanIsPutBack)
     EXPECT_EQ(ReadFile(kTavoinfo), before);
 }
 
-TEST_F(NetIPv6, WhatCannotWakeSaysWhy)
+TEST_F(NetIPv6, ReportsWhyACardCannotWake)
 {
     const struct {
         const char *settings;

@@ -296,7 +296,7 @@ TEST_F(NetSettings, AGatewayThatCannotBeReachedIsPutBack)
     EXPECT_THAT(commands_.Commands(), IsEmpty()) << "looked at before the old route goes";
 }
 
-TEST_F(NetSettings, AnUnknownRouteTableIsSaidSo)
+TEST_F(NetSettings, ReportsAnUnknownRouteTable)
 {
     tree_.Put("/proc/net/route", "Destination Gateway\n");
     char text[16];

@@ -50,7 +50,7 @@ bool HasSuperblock(const std::string &member)
     return RAIDSBGet(member.c_str(), &superblock) == 1 && superblock.szUuid[0] != 0;
 }
 
-// A disk that is gone is noticed when somebody writes.
+// A missing disk is noticed at the next write.
 void Touch(const std::string &array, int mib = 0)
 {
     Shell("dd if=/dev/urandom of=" + array + " bs=64k count=64 oflag=direct,seek_bytes seek=" + std::to_string(mib) +

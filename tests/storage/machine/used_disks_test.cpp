@@ -1,4 +1,4 @@
-// Real disks that had a life: a volume was on them, they were pulled, they are large, they are somebody else's.
+// Real disks that were used before: they held a volume, were pulled, are large, or belong to another system.
 #include "real_storage.h"
 
 #include "support/captured_log.h"
@@ -258,7 +258,7 @@ TEST_P(MachineUsedDisks, AVolumeOfFifteenTebibytes)
         "dd if=$lv bs=4096 skip=$last iflag=direct | cmp - /tmp/random && dd if=$lv bs=4096 count=1 | cmp - /tmp/zero");
 }
 
-TEST_P(MachineUsedDisks, SomebodysStickStaysAsItIs)
+TEST_P(MachineUsedDisks, LeavesAForeignStickAlone)
 {
     test::Happen("plug usb --blank");
     const std::string stick = Told("for block in /sys/block/sd*; do "

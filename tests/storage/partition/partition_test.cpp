@@ -290,7 +290,7 @@ TEST_F(Partitions, CleanRunsExactlyTheseCommands)
     EXPECT_EQ(PartitionCleanRAID("/dev/sdb", 0), -1);
 }
 
-TEST_F(Partitions, WhatIsInUseIsNotHalfCleaned)
+TEST_F(Partitions, RefusesToCleanPartitionsInUse)
 {
     const int version = 7;
     const struct {

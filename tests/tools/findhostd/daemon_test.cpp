@@ -1,4 +1,4 @@
-// Appliances that find each other over real UDP, and what somebody hostile on the same cable can do: nothing.
+// Appliances that find each other over real UDP, and attacks from the same cable, which have no effect.
 #include "packet.h"
 
 #include "tavo_fhost.h"
@@ -167,7 +167,7 @@ TEST_F(Daemons, AreFoundFromTheInterfacesThatWork)
         EXPECT_THAT(Lines(ListText()), UnorderedElementsAre("6,240,nas2,192.0.2.2,eth0", "6,240,nas3,192.0.2.3,eth0"));
         EXPECT_THAT(Discover(2), UnorderedElementsAre("nas2(192.0.2.2)", "nas3(192.0.2.3)"));
 
-        // An address that somebody stored and the kernel has lost is a failure.
+        // An address that is stored but missing in the kernel is a failure.
         WriteFile("/etc/sysconfig/network-scripts/ifcfg-eth1", "DEVICE=eth1\nBOOTPROTO=static\nIPADDR=198.51.100.1\n");
         EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0x2u);
         int result = 0;
@@ -343,7 +343,7 @@ TEST_F(Daemons, LeaveTheCallersStreams)
     }));
 }
 
-TEST_F(Daemons, ALockOfSomebodyElseIsInNobodysWay)
+TEST_F(Daemons, IgnoreALockOfAnotherProgram)
 {
     EXPECT_TRUE(nodes_[0]->Run([] {
         WriteFile(kPidFile, "1\n");

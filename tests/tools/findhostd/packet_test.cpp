@@ -74,7 +74,7 @@ TEST(Packet, ARepliesRecordsComeInAnyOrder)
     EXPECT_EQ(std::memcmp(&host, &expected, sizeof host), 0);
 }
 
-TEST(Packet, WhatIsNotWholeOrNotSoundIsNothing)
+TEST(Packet, RejectsIncompleteAndInvalidPackets)
 {
     const std::string whole = kHeader + kReplyKind + kModel + kProtocol + kName + kAddress;
     const auto with = [&](const std::string &part, const std::string &instead) {
@@ -168,7 +168,7 @@ TEST(HostTable, KeepsTheFirstAnswerOfACollection)
     EXPECT_FALSE(table.Put(MakeHost("one", "192.0.2.1"), 0, now)) << "as it is there";
     EXPECT_FALSE(table.Put(MakeHost("forged", "192.0.2.1"), 0, now + 1));
     EXPECT_FALSE(table.Put(MakeHost("one", "192.0.2.1"), 3, now + 1)) << "over another interface";
-    table.NoteQuery(now += 5000);  // anybody may ask again
+    table.NoteQuery(now += 5000);  // every host may ask again
     EXPECT_FALSE(table.Put(MakeHost("forged", "192.0.2.1"), 0, now));
     EXPECT_EQ(table.Text(now), "16909060,240,one,192.0.2.1,\n");
     table.NoteQuery(now += 5000);

@@ -1,4 +1,4 @@
-// tavoctl user, group and quota: what becomes of the files, and what is refused before anything does.
+// tavoctl user, group and quota: their changes of the files, and refusals before any change.
 #include "run_tavoctl.h"
 
 #include "support/domain_entries.h"
@@ -117,7 +117,7 @@ TEST_F(TavoctlAccounts, UsersAreAddedChangedAndRenamed)
     EXPECT_TRUE(PasswordIs("anna", "secret one"));
     EXPECT_TRUE(PasswordIs("berta", ""));
 
-    // What is not given stays, the password with its hashes too.
+    // Facts that are not given stay, the password with its hashes too.
     const std::string hash = Fields(shadow, "anna").at(1);
     const std::vector<std::string> samba_before = Fields(samba, "anna");
     ExpectDone({"user", "modify", "ANNA", "--description", "", "--cannot-change-password", "yes"});
@@ -208,7 +208,7 @@ struct Refusal {
     const char *reason;
 };
 
-TEST_F(TavoctlAccounts, WhatIsRefusedChangesNothing)
+TEST_F(TavoctlAccounts, RefusalsChangeNothing)
 {
     const Refusal refusals[] = {
         {{"user", "add", "--empty-password", "Anna"}, 1, "ERR_USER_EXISTS"},
@@ -333,7 +333,7 @@ TEST_F(TavoctlAccounts, NamesThatMislead)
     EXPECT_THAT(Tavoctl({"user", "add", "--unknown-password", "0815"}).err, HasSubstr("warning"));
     EXPECT_THAT(Tavoctl({"user", "add", "--unknown-password", "a b"}).err, HasSubstr("warning"));
     EXPECT_THAT(Tavoctl({"user", "rename", "a b", "\xD0\xB0nna"}).err, HasSubstr("warning"));
-    // All ids were handed out once: the next is one that somebody had.
+    // All ids were assigned once, so the next one belonged to a deleted user.
     WriteFile(misc, "#$_@UID__INDEX@_$3072$\n" + ReadFile(misc).substr(ReadFile(misc).find('\n') + 1));
     const test::Ran ran = Tavoctl({"user", "add", "--unknown-password", "carla"});
     EXPECT_EQ(ran.status, 0) << ran;

@@ -1,4 +1,4 @@
-// What holds for every verb of tavoctl, by being registered: the exit statuses.
+// Rules for every registered verb of tavoctl: the exit statuses.
 #include "run_tavoctl.h"
 
 #include "support/scratch_dir.h"
@@ -119,7 +119,7 @@ TEST(TavoctlContract, AWrongArgumentIsNamedWithWhatIsAllowed)
 }
 
 // The first required argument names something that must be there.
-TEST(TavoctlContract, WhatIsNotThereIsNotFound)
+TEST(TavoctlContract, MissingObjectsAreNotFound)
 {
     const std::set<std::string> kinds = {"user", "group", "setting", "service", "disk", "array", "code", "file"};
     // These make what is not there, or ask the machine's own tools first.
@@ -181,7 +181,7 @@ TEST(TavoctlContract, LimitedCallersGetAMessage)
     EXPECT_EQ(status("cd /etc && ls -A > /tmp/names; ulimit -f 0; tavoctl conf set key value 2>/tmp/err"), 1);
     EXPECT_EQ(test::ReadFile("/etc/tavoinfo.conf"), before);
     EXPECT_EQ(status("cd /etc && ls -A | cmp - /tmp/names"), 0);
-    // No descriptor is not a lock that somebody else holds.
+    // A lack of descriptors is not reported as a lock of another program.
     EXPECT_EQ(status("exec >/dev/null 2>/tmp/err; ulimit -n 4; exec tavoctl user list"), 1);
     EXPECT_THAT(test::ReadFile("/tmp/err"), Not(HasSubstr("another program")));
 }

@@ -155,7 +155,7 @@ TEST_F(MachineVolumes, AVolumeGrowsWithItsArray)
     EXPECT_EQ(Facts({"volume", "grow", "--json", "3"}).at("changed"), false);
 }
 
-TEST_F(MachineVolumes, WhatCannotBeStartedSafelyIsSaidAndForcedOnRequest)
+TEST_F(MachineVolumes, StartsUnsafeArraysOnlyOnRequest)
 {
     Succeeds({"raid", "create", "--yes", "--level", "5", "--no-sync", "md2", "sda", "sdb", "sdc"});
     Told("dd if=/dev/urandom of=/dev/md2 bs=64k count=16 oflag=direct");

@@ -108,13 +108,13 @@ inline Ran TavoctlAtTerminal(const Words &words, const std::vector<Answer> &answ
     return ran;
 }
 
-// What is typed is there before the program asks.
+// The input is typed before the program asks.
 inline Ran TavoctlAtTerminal(const Words &words, const std::string &typed = {})
 {
     return TavoctlAtTerminal(words, {{"", typed}});
 }
 
-// What a document says without its format_version: the items of a list, or the fields of one thing.
+// A document without its format_version: the items of a list, or the fields of one object.
 inline nlohmann::json Facts(const Ran &ran)
 {
     nlohmann::json document = nlohmann::json::parse(ran.out, nullptr, false);

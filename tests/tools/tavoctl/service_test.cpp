@@ -105,7 +105,7 @@ TEST_F(TavoctlService, ListShowsWhatIsEnabledAndWhatRuns)
                              "\nmedia +yes +no +- +- +music,video,photo +/volume2 +yes\n(.|\n)*"));
 }
 
-TEST_F(TavoctlService, WhatTheModelLacksIsListedOnlyWithAll)
+TEST_F(TavoctlService, ListsMissingServicesOnlyWithAll)
 {
     ASSERT_EQ(Tavoctl({"conf", "set", "--defaults", "supportsurveillance", "no"}).status, 0);
     EXPECT_EQ(Row("surveillance"), nullptr);
@@ -221,7 +221,7 @@ TEST_F(TavoctlService, VolumeBindsTheFoldersAndRestoreFindsThemAgain)
     EXPECT_EQ(Tavoctl({"service", "volume", "ftp", "/volume1"}).status, 2) << "it keeps no data";
     EXPECT_EQ(Tavoctl({"service", "restore", "/volume7"}).status, 3);
 
-    // The volume is away and comes back; meanwhile somebody took the link away.
+    // The volume is unmounted and comes back; meanwhile the link was removed.
     ASSERT_EQ(Tavoctl({"service", "stop", "web"}).status, 0);
     ASSERT_EQ(::unlink("/var/services/web"), 0);
     EXPECT_EQ(Tavoctl({"service", "restore", "/volume1"}).status, 0);

@@ -1,4 +1,4 @@
-// tavoctl conf and section: what becomes of the files.
+// tavoctl conf and section: their changes of the files.
 #include "run_tavoctl.h"
 
 #include "support/scratch_dir.h"
@@ -61,7 +61,7 @@ const Change changes[] = {
     {{"section", "set", "--rename", "c", "b"}, sections, 0, "; head\n[a]\nk=1\n# note\nl=2\n[c]\nk=3\n"},
     {{"section", "set", "c", "k=1"}, sections, 3, sections},
     {{"section", "set", "a", "=1"}, sections, 2, sections},
-    // What a rewrite would lose is a reason to refuse.
+    // Lines that a rewrite would lose are a reason to refuse.
     {{"section", "set", "a", "k=2"}, "[a]\nk=1\n[broken\nl=2\n", 1, "[a]\nk=1\n[broken\nl=2\n"},
     {{"section", "set", "a", "k=2"}, "[a]\nk=1\ninclude other\n", 1, "[a]\nk=1\ninclude other\n"},
     {{"section", "set", "a", "k=2"}, "[a]\nk=1\n[a]\nk=3\n", 1, "[a]\nk=1\n[a]\nk=3\n"},

@@ -1,4 +1,4 @@
-// What tavoctl makes of the pages of a drive.
+// tavoctl's reading of the pages of a drive.
 #include "storage/smart_pages.h"
 
 #include <gtest/gtest.h>

@@ -374,7 +374,7 @@ TEST_F(NetApply, HostileDocumentsAreRefusedWithThePlace)
 }
 
 // The last step fails: a route through a router that no card reaches.
-TEST_F(NetApply, AChangeThatFailsLeavesEverythingAsItWas)
+TEST_F(NetApply, AFailedChangeLeavesEverythingUnchanged)
 {
     EXPECT_TRUE(here_->Run([&] {
         const json failing = Document(

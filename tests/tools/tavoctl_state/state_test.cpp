@@ -166,7 +166,7 @@ TEST_F(TavoctlStateOfABox, ComesBackOnAFreshOneAndThenChangesNothing)
     }));
 }
 
-// Somebody changed the address by hand and forgot the router.
+// The address was changed by hand, but not the router.
 TEST_F(TavoctlStateOfABox, AStoredGatewayOutOfReachIsShownAndNotRefused)
 {
     EXPECT_TRUE(Box("here")->Run([] {
@@ -223,7 +223,7 @@ TEST_F(TavoctlState, ANewUserWithoutAHashIsLocked)
     EXPECT_EQ(json::parse(again.out).at("changed"), false) << again;
 }
 
-TEST_F(TavoctlState, WhatIsRefusedIsRefusedBeforeTheFirstChange)
+TEST_F(TavoctlState, RefusesBeforeTheFirstChange)
 {
     ASSERT_EQ(Tavoctl({"user", "add", "holder", "--uid", "2001", "--unknown-password"}).status, 0);
     ASSERT_EQ(Tavoctl({"group", "add", "held", "--gid", "70000"}).status, 0);

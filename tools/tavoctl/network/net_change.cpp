@@ -81,7 +81,7 @@ int StandAlone()
     return ::signalfd(-1, &signals, SFD_CLOEXEC);
 }
 
-// Returns whether somebody confirms in time.
+// Returns whether the change is confirmed in time.
 bool IsConfirmed(int command, int signals, int seconds)
 {
     std::int64_t until = Now() + (seconds + longest_change) * 1000ll;

@@ -42,7 +42,7 @@ bool WriteAll(const std::string &path, const std::string &text)
     return done;
 }
 
-// Root keeps every user id, as far as it has them itself; anybody else becomes the only user inside.
+// Root keeps every user id that it has itself; any other user becomes the only user inside.
 std::string MapOf(const char *file, unsigned own)
 {
     if (::geteuid() != 0)
