@@ -1,4 +1,4 @@
-// What all verbs of tavoctl share: exit statuses, refusals, tables and JSON, failures, questions, completion.
+// The common parts of all verbs of tavoctl: exit statuses, refusals, tables and JSON, failures, questions, completion.
 #include "run_tavoctl.h"
 
 #include "support/scratch_dir.h"
@@ -15,6 +15,7 @@
 namespace {
 
 using nlohmann::json;
+using test::Ran;
 using test::ReadFile;
 using test::ScratchDir;
 using test::Tavoctl;
@@ -339,6 +340,17 @@ TEST(TavoctlFrame, ColoursAndThePagerAreForTerminals)
         EXPECT_EQ(out.find("\x1b[") != out.npos, coloured) << variable << value << rows << out;
         EXPECT_EQ(out.starts_with("paged "), paged) << variable << value << rows << out;
         EXPECT_THAT(Tavoctl(list).out, Not(AnyOf(HasSubstr("\x1b"), HasSubstr("paged"))));
+    }
+    // A pager that ends before it has read everything costs neither the rest of the answer nor the exit status.
+    std::string large = "a=degraded\n";
+    for (int i = 0; i < 9000; ++i)
+        large += "key" + std::to_string(i) + "=some value\n";
+    WriteFile(dir / "f", large);
+    for (const char *pager : {"/no/such/program 2>/dev/null", "head -n 2"}) {
+        ::setenv("PAGER", pager, 1);
+        const Ran ran = TavoctlAtTerminal(list, {}, 3);
+        EXPECT_THAT(ran.out, HasSubstr("degraded")) << pager;
+        EXPECT_EQ(ran.status, 0) << pager;
     }
 }
 
