@@ -2,6 +2,7 @@
 #include "run_tavoctl.h"
 
 #include "support/scratch_dir.h"
+#include "support/text_lines.h"
 
 #include "tavo_error.h"
 
@@ -15,6 +16,7 @@
 namespace {
 
 using nlohmann::json;
+using test::Lines;
 using test::Ran;
 using test::ReadFile;
 using test::ScratchDir;
@@ -27,15 +29,6 @@ using testing::AnyOf;
 using testing::HasSubstr;
 using testing::Not;
 using testing::StartsWith;
-
-std::vector<std::string> Lines(const std::string &text)
-{
-    std::vector<std::string> lines;
-    std::istringstream in(text);
-    for (std::string line; std::getline(in, line);)
-        lines.push_back(line);
-    return lines;
-}
 
 // tavoctl is a program of its own: where only the entering program can start one, there is nothing to test.
 class NeedsPrograms : public testing::Environment {
