@@ -9,6 +9,7 @@
 #include <new>
 
 #include <strings.h>
+#include <unistd.h>
 
 namespace tavo {
 
@@ -39,8 +40,9 @@ std::optional<bool> ReadSetting(const char *path, const char *key, const char *v
         return true;
     if (tavoerrno == ERR_OUT_OF_MEMORY)
         throw std::bad_alloc();
-    const bool unreadable =
-        tavoerrno == ERR_READ_FAILED || (tavoerrno == ERR_OPEN_FAILED && errno != ENOENT && errno != EACCES);
+    // Settings that are not for other users are, for these, not there. Nothing is closed to root.
+    const bool absent = errno == ENOENT || (errno == EACCES && ::geteuid() != 0);
+    const bool unreadable = tavoerrno == ERR_READ_FAILED || (tavoerrno == ERR_OPEN_FAILED && !absent);
     return unreadable ? std::nullopt : std::optional(false);
 }
 

@@ -17,8 +17,8 @@ bool SettingIsYes(const char *path, const char *key) noexcept;
 // Returns whether the value is "yes" in any case of letters: services and capabilities of the model.
 bool SettingSaysYes(const char *path, const char *key) noexcept;
 
-// Returns whether the key has exactly that value; nothing when the file is there and cannot be read. Leaves the error
-// state alone. Throws bad_alloc.
+// Returns whether the key has exactly that value; nullopt when the file is there and cannot be read. A file that is closed
+// to a program without root has no keys for it. Leaves the error state alone. Throws bad_alloc.
 std::optional<bool> ReadSetting(const char *path, const char *key, const char *value);
 
 }  // namespace tavo
