@@ -458,6 +458,56 @@ TEST_F(TavoctlAccounts, ImportIsOneBatch)
     EXPECT_TRUE(PasswordIs("user49", "pw49"));
 }
 
+TEST_F(TavoctlAccounts, ABatchSaysWhatBecameOfEachEntry)
+{
+    const auto entries = [](const test::Ran &ran) {
+        std::string text;
+        const json document = test::Facts(ran);
+        for (const json &entry : document.at("entries"))
+            text += entry.at("object").get<std::string>() + " " + entry.at("result").get<std::string>() +
+                    (entry.at("name").is_null() ? "" : " " + entry.at("name").get<std::string>()) + "\n";
+        return text;
+    };
+    // Rights of an earlier carla cannot be taken away.
+    ExpectDone({"user", "add", "carla", "--empty-password"});
+    ExpectDone({"group", "add", "crew"});
+    WriteFile("/usr/tavo/etc/smb.conf", "[x]\n\tvalid users = carla,@crew\n");
+    ASSERT_EQ(::mkdir("/usr/tavo/etc/smb.conf.tmp", 0700), 0);
+    ExpectDone({"user", "delete", "--yes", "carla"});
+    ExpectDone({"group", "delete", "--yes", "crew"});
+    const std::string list = "name,password\nx,1\ncarla,1\nanna,\n";
+    const Words import = {"user", "import", "--update", "--json", "-"};
+    Words dry = import;
+    dry.emplace_back("--dry-run");
+    EXPECT_EQ(entries(Tavoctl(dry, list)), "user x planned\nuser carla planned\nuser anna unchanged\n");
+    test::Ran ran = Tavoctl(import, list);
+    EXPECT_EQ(ran.status, 1) << ran;
+    EXPECT_EQ(entries(ran), "user x done\nuser carla failed ERR_REMOVE_FAILED\nuser anna unchanged\n");
+    EXPECT_THAT(ran.out, Not(HasSubstr("\"user carla\",\n      \"column\"")));
+    const json failure = json::parse(ran.err, nullptr, false);
+    ASSERT_TRUE(failure.is_object()) << ran;
+    EXPECT_EQ(failure.at("error").at("attempted"), "import -, carla");
+    EXPECT_TRUE(PasswordIs("x", "1"));
+    EXPECT_EQ(Line(passwd, "carla"), "");
+    ran = Tavoctl({"user", "import", "-"}, "name,password\ncarla,1\ny,1\n");
+    EXPECT_EQ(ran.status, 1) << ran;
+    EXPECT_THAT(ran.err, HasSubstr("cannot import -, carla: ERR_REMOVE_FAILED"));
+    EXPECT_NE(Line(passwd, "y"), "");
+    ran = Tavoctl({"group", "import", "--json", "-"}, "name,members\ncrew,anna\ntwo,\n");
+    EXPECT_EQ(ran.status, 1) << ran;
+    EXPECT_EQ(entries(ran), "group crew failed ERR_REMOVE_FAILED\ngroup two done\n");
+    ASSERT_EQ(::rmdir("/usr/tavo/etc/smb.conf.tmp"), 0);
+
+    // An account that has no line in the shadow file has nothing to lock.
+    std::string hashes = ReadFile(shadow);
+    hashes.erase(hashes.find("\nx:"), hashes.find('\n', hashes.find("\nx:") + 1) - hashes.find("\nx:"));
+    WriteFile(shadow, hashes);
+    ran = Tavoctl({"user", "lock", "--json", "x", "ANNA", "y"});
+    EXPECT_EQ(ran.status, 3) << ran;
+    EXPECT_EQ(entries(ran), "user x failed ERR_NO_SUCH_USER\nuser anna done\nuser y done\n");
+    EXPECT_EQ(entries(Tavoctl({"user", "delete", "--yes", "--json", "Y", "x"})), "user y done\nuser x done\n");
+}
+
 TEST_F(TavoctlAccounts, AListThatIsWrongAnywhereIsRefusedWhole)
 {
     const struct {

@@ -22,7 +22,8 @@ struct GivenHashes {
 
 // The changes that a list of users asks for.
 struct UserPlan {
-    std::string path;  // of the list
+    std::string path;                       // of the list
+    std::vector<std::string> entries = {};  // the names of all rows, also of those that change nothing
     std::vector<UserChange> changes = {};
     std::vector<GivenHashes> hashes = {};
     std::vector<std::string> locked = {};  // new ones that cannot be used until they have a password
@@ -33,7 +34,9 @@ struct UserPlan {
 // a new user whose row has none; nullptr: the user is locked, and an empty hash is not a password.
 UserPlan PlanUsers(Call &call, const std::string &path, bool update, const std::vector<AccountRow> &rows,
                    const PasswordChoice *password);
-void CarryOut(const UserPlan &plan);
+
+// Returns what the library refused; the others are done. Throws a Failure when nothing was changed.
+EntryFailures CarryOut(const UserPlan &plan);
 
 // Without the accounts of a domain, which its controller keeps.
 std::vector<User> LocalUsers();
@@ -44,13 +47,17 @@ Table ExportedUsers(const std::vector<User> &users, bool hashes);
 // The groups that are there, and what a list makes of them.
 struct GroupPlan {
     std::string path;
-    std::vector<std::pair<std::optional<Group>, Group>> changes;
+    std::vector<std::string> entries = {};
+    std::vector<std::pair<std::optional<Group>, Group>> changes = {};
 };
 
 // `member_name`: the name of a member as its account has it; throws a Failure for one that is not a user.
 GroupPlan PlanGroups(Call &call, const std::string &path, bool update, const std::vector<AccountRow> &rows,
                      const std::function<std::string(const std::string &)> &member_name);
-void CarryOut(const GroupPlan &plan);
+EntryFailures CarryOut(const GroupPlan &plan);
+
+// For a plan that is done as a whole or not at all: throws the first failure, with how many there are.
+void ThrowFirst(const EntryFailures &failures);
 
 // All that the library lists, each with those of its members that are users.
 std::vector<Group> AllGroups();

@@ -63,22 +63,23 @@ void RefuseTooMany(int additions, const std::string &attempted)
         throw Failure{.attempted = attempted, .code = ERR_TOO_MANY_USERS};
 }
 
-void DeleteAll(const std::vector<std::string> &names, int (*remove)(const char *const *, int),
-               bool (*is_there)(const std::string &), const std::string &attempted)
+EntryFailures DeleteAll(const std::vector<std::string> &names, int (*remove)(const char *const *, int),
+                        bool (*is_there)(const std::string &), const std::string &noun)
 {
     std::vector<const char *> texts;
     for (const std::string &name : names)
         texts.push_back(name.c_str());
-    TLIBErrSet(ERR_SUCCESS);
-    const int result = remove(texts.data(), static_cast<int>(texts.size()));
-    Failure failure = LibraryFailure(attempted);
-    if (result != 0)
-        throw failure;
-    for (const std::string &name : names)
-        if (is_there(name)) {
-            failure.reason = name + " is still there";
-            throw failure;
-        }
+    Must(remove(texts.data(), static_cast<int>(texts.size())) == 0,
+         "delete the " + noun + (names.size() > 1 ? "s " : " ") + SomeOf(names));
+    EntryFailures failures;
+    for (const std::string &name : names) {
+        const char *const again[] = {name.c_str()};
+        if (is_there(name))
+            TryAgain(
+                name, "delete the " + noun + " " + name, failures, [&] { return remove(again, 1); },
+                [&] { return !is_there(name); });
+    }
+    return failures;
 }
 
 }  // namespace tavoctl

@@ -2,10 +2,30 @@
 #ifndef TAVOCTL_ACCOUNT_RULES_H
 #define TAVOCTL_ACCOUNT_RULES_H
 
+#include "frame/failure.h"
+
+#include "tavo_error.h"
+
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace tavoctl {
+
+// The names of entries of a batch that failed, with the reasons. A batch of the library records the reason of its last one
+// alone: each is tried once more by itself.
+using EntryFailures = std::vector<std::pair<std::string, Failure>>;
+
+// Tries that: `call` of the library, and whether the entry is as it should be then. Adds a failure.
+template <class Call, class IsDone>
+void TryAgain(const std::string &name, const std::string &attempted, EntryFailures &failures, Call call, IsDone is_done)
+{
+    TLIBErrSet(ERR_SUCCESS);
+    const bool called = call() == 0;
+    const Failure failure = LibraryFailure(attempted);
+    if (!called || !is_done())
+        failures.emplace_back(name, failure);
+}
 
 // The first few of the names, with commas between them.
 std::string SomeOf(const std::vector<std::string> &names);
@@ -25,10 +45,10 @@ void RefuseTakenId(const std::string &name, int uid);
 // Throws a Failure when the model allows fewer than so many further accounts.
 void RefuseTooMany(int additions, const std::string &attempted);
 
-// Deletes accounts or groups by the library's function for that, in one batch. Throws a Failure when it fails, or when
-// one of them still exists afterwards.
-void DeleteAll(const std::vector<std::string> &names, int (*remove)(const char *const *, int),
-               bool (*is_there)(const std::string &), const std::string &attempted);
+// Deletes accounts or groups by the library's function for that, in one batch; `noun` is "user" or "group". Returns
+// those that are still there. Throws a Failure when nothing was deleted.
+EntryFailures DeleteAll(const std::vector<std::string> &names, int (*remove)(const char *const *, int),
+                        bool (*is_there)(const std::string &), const std::string &noun);
 
 }  // namespace tavoctl
 

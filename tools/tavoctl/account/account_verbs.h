@@ -7,6 +7,7 @@
 #include "account/account_rules.h"
 #include "frame/failure.h"
 #include "frame/input_file.h"
+#include "frame/terminal_text.h"
 #include "frame/verb.h"
 
 #include <charconv>
@@ -57,7 +58,7 @@ Action AccountDelete(Arguments &in)
     const auto system = in.Flag("--system", std::string("also a ") + Kind::noun + " that the system needs");
     const auto force = in.Flag("--force", Kind::force_help);
     return [=](Call &call) {
-        std::string list;
+        std::vector<std::string> doomed;
         for (const std::string &name : *names) {
             const auto record = Kind::Read(name);
             const std::string attempted = std::string("delete the ") + Kind::noun + " " + name;
@@ -66,14 +67,18 @@ Action AccountDelete(Arguments &in)
             Kind::RefuseDelete(record, attempted);
             if (!*force)
                 Kind::RefuseUsed(record, attempted);
-            list += (list.empty() ? "" : ", ") + record.name;
-            call.Compare(std::string(Kind::noun) + " " + record.name, Kind::columns, std::optional(record),
-                         std::optional<typename Kind::Record>());
+            doomed.push_back(record.name);
+            const std::string object = std::string(Kind::noun) + " " + record.name;
+            call.BeginEntry(object);
+            call.Compare(object, Kind::columns, std::optional(record), std::optional<typename Kind::Record>());
         }
-        if (call.Proceed("Delete " + list + Kind::delete_warning + "?"))
-            DeleteAll(
-                *names, Kind::remove, [](const std::string &name) { return Kind::Find(name).has_value(); },
-                "delete " + list);
+        if (!call.Proceed("Delete " + Joined(doomed, ", ") + Kind::delete_warning + "?"))
+            return;
+        const auto is_there = [](const std::string &name) {
+            return Kind::Find(name).has_value();
+        };
+        for (const auto &[name, failure] : DeleteAll(doomed, Kind::remove, is_there, Kind::noun))
+            call.FailEntry(std::string(Kind::noun) + " " + name, failure);
     };
 }
 

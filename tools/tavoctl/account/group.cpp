@@ -168,8 +168,11 @@ Action GroupImport(Arguments &in)
         const GroupPlan plan =
             PlanGroups(call, *path, *update, ParseAccountRows(ReadWhole(*path), Names(group_export_columns)),
                        [](const std::string &name) { return ReadUser(name).name; });
+        for (const std::string &name : plan.entries)
+            call.BeginEntry("group " + name);
         if (call.Proceed())
-            CarryOut(plan);
+            for (const auto &[name, failure] : CarryOut(plan))
+                call.FailEntry("group " + name, failure);
     };
 }
 
@@ -201,7 +204,7 @@ GroupPlan PlanGroups(Call &call, const std::string &path, bool update, const std
                      const std::function<std::string(const std::string &)> &member_name)
 {
     ImportedRows<GroupKind> rows(path, update);
-    GroupPlan plan = {path, {}};
+    GroupPlan plan = {.path = path};
     for (const AccountRow &row : list) {
         const std::optional<Group> old = rows.Present(row);
         Group group = old.value_or(Group{});
@@ -221,6 +224,7 @@ GroupPlan PlanGroups(Call &call, const std::string &path, bool update, const std
             group.gid = *gid;
         }
         CheckGroup(group, rows.Attempted(row));
+        plan.entries.push_back(group.name);
         const std::size_t before = call.report.changes.size();
         call.Compare("group " + group.name, group_columns, old, std::optional(group));
         if (call.report.changes.size() > before)
@@ -229,15 +233,20 @@ GroupPlan PlanGroups(Call &call, const std::string &path, bool update, const std
     return plan;
 }
 
-void CarryOut(const GroupPlan &plan)
+EntryFailures CarryOut(const GroupPlan &plan)
 {
     Progress progress("importing");
+    EntryFailures failures;
     for (std::size_t i = 0; i < plan.changes.size(); ++i) {
         const auto &[old, group] = plan.changes[i];
         progress.Show(std::to_string(i) + " of " + std::to_string(plan.changes.size()));
-        SetGroup(old ? std::optional(old->name) : std::nullopt, group,
-                 "import " + plan.path + ", " + std::to_string(i) + " groups are done, the next is " + group.name);
+        try {
+            SetGroup(old ? std::optional(old->name) : std::nullopt, group, "import " + plan.path + ", " + group.name);
+        } catch (const Failure &failure) {
+            failures.emplace_back(group.name, failure);
+        }
     }
+    return failures;
 }
 
 std::vector<Group> AllGroups()
@@ -277,17 +286,17 @@ and of Samba.
 
 tavoctl group rename staff team)",
               AccountRename<GroupKind>);
-    group.Add("delete", changes | destroys, Answer::Change(), R"(Deletes groups, also from the lists of shared folders,
+    group.Add("delete", changes | destroys, Answer::Batch(), R"(Deletes groups, also from the lists of shared folders,
 all in one batch. Their members stay. Nothing is done when one of them is not there, or is the primary group of a user.
 
 tavoctl group delete staff
 tavoctl group delete --yes staff guests)",
               AccountDelete<GroupKind>);
-    group.Add("import", changes, Answer::Change(),
+    group.Add("import", changes, Answer::Batch(),
               R"(Adds the groups of a list, and with --update changes those that are
 there. The list is comma-separated values under a line of field names (name, gid, description, members), or the JSON of
-export. Only name is required. Everything is looked at before anything is changed; then it goes group by group, and
-stops at the first that fails.
+export. Only name is required. Everything is looked at before anything is changed; then it goes group by group. One that
+fails does not keep the others from being done.
 
 tavoctl group import --dry-run groups.csv
 tavoctl group import --update groups.json)",

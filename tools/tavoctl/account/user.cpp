@@ -112,7 +112,7 @@ Id, password, groups, shared folders and home folder go with it.
 
 tavoctl user rename anna anna.berg)",
              AccountRename<UserKind>);
-    user.Add("delete", changes | destroys, Answer::Change(),
+    user.Add("delete", changes | destroys, Answer::Batch(),
              R"(Deletes accounts with their quotas, group memberships and
 home folders, all in one batch. Nothing is done when one of them is not there, is logged in or has processes.
 
@@ -132,13 +132,13 @@ day, or takes the limit away. `user show` says whether an account has expired.
 tavoctl user expire anna 2027-01-31
 tavoctl user expire anna never)",
              UserExpire);
-    user.Add("lock", changes, Answer::Change(),
+    user.Add("lock", changes, Answer::Batch(),
              R"(Locks accounts: their passwords fit no more, neither at a login nor for
 Samba, and come back with unlock. Open sessions and SSH keys are not touched. A new password unlocks, too.
 
 tavoctl user lock anna berta)",
              UserLock);
-    user.Add("unlock", changes, Answer::Change(), R"(Unlocks accounts with the passwords that they had.
+    user.Add("unlock", changes, Answer::Batch(), R"(Unlocks accounts with the passwords that they had.
 
 tavoctl user unlock anna)",
              UserUnlock);
@@ -148,7 +148,7 @@ tavoctl user unlock anna)",
 tavoctl user aging anna --max 90 --warn 14
 tavoctl user aging anna --min 0 --max 99999)",
              UserAging);
-    user.Add("import", changes, Answer::Change(), R"(Adds the accounts of a list in one batch, and with --update changes
+    user.Add("import", changes, Answer::Batch(), R"(Adds the accounts of a list in one batch, and with --update changes
 those that are there. The list is comma-separated values under a line of field names, or the JSON of export; the fields
 are those of export, and password in clear text. Only name is required. Everything is looked at before anything is
 changed.

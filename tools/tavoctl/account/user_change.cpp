@@ -60,7 +60,7 @@ void ChangeUser(Call &call, const std::string &name, const std::string &attempte
     edit(after);
     call.Compare("user " + before.name, user_columns, std::optional(before), std::optional(after));
     if (call.Proceed())
-        SetUsers({{.old_name = name, .user = after}}, attempted);
+        SetUser({.old_name = name, .user = after}, attempted);
 }
 
 }  // namespace
@@ -85,7 +85,7 @@ Action UserAdd(Arguments &in)
             return;
         user.password = password.For(*name);
         const int last = LastUserId();
-        SetUsers({{.old_name = {}, .user = user}}, attempted);
+        SetUser({.old_name = {}, .user = user}, attempted);
         WarnOfName(*name);
         const User added = ReadUser(*name);
         if (user.uid < 0)
@@ -121,7 +121,7 @@ Action UserPasswd(Arguments &in)
         if (user.password == password && !password.empty())
             throw UsageFailure(attempted, "this is the hash of the one that is set");
         user.password = password;
-        SetUsers({{.old_name = *name, .user = user}}, attempted);
+        SetUser({.old_name = *name, .user = user}, attempted);
     };
 }
 

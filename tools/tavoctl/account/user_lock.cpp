@@ -30,6 +30,7 @@ Action SetLock(Arguments &in, bool locked)
             if (IsSystemUser(user) && !*system)
                 throw UsageFailure(attempted(name), "the system needs it", "--system does it anyway");
             const std::string samba = SambaState(user.name);
+            call.BeginEntry("user " + user.name);
             call.Change("user " + user.name, "password", PasswordState(user.password),
                         StateAfter(user, locked, attempted(name)));
             call.Change("user " + user.name, "samba", samba, samba == "none" ? "none" : locked ? "disabled" : "on");
@@ -37,7 +38,8 @@ Action SetLock(Arguments &in, bool locked)
         if (!call.Proceed())
             return;
         for (const std::string &name : *names)
-            Must(TAVOUserLockSet(name.c_str(), locked) == 0, attempted(name));
+            if (TAVOUserLockSet(name.c_str(), locked) != 0)
+                call.FailEntry("user " + ReadUser(name).name, LibraryFailure(attempted(name)));
     };
 }
 

@@ -132,7 +132,9 @@ std::vector<std::string> UserNames()
     return UserNames({}, {});
 }
 
-void SetUsers(const std::vector<UserChange> &changes, const std::string &attempted)
+namespace {
+
+int SetInOneCall(const std::vector<UserChange> &changes)
 {
     std::vector<TAVOUSER> records;
     for (const UserChange &change : changes)
@@ -143,24 +145,38 @@ void SetUsers(const std::vector<UserChange> &changes, const std::string &attempt
         users.push_back(&records[i]);
         old_names.push_back(changes[i].old_name ? changes[i].old_name->c_str() : nullptr);
     }
+    return TAVOUserSet(old_names.data(), users.data(), static_cast<int>(users.size()));
+}
+
+}  // namespace
+
+EntryFailures SetUsers(const std::vector<UserChange> &changes, const std::string &attempted)
+{
+    const AgesByKey ages = ReadPasswordAges();
+    Must(SetInOneCall(changes) == 0, attempted);
+    EntryFailures failures;
+    for (const UserChange &change : changes) {
+        const std::size_t before = failures.size();
+        if (!IsDone(change))
+            TryAgain(
+                change.user.name, attempted + ", " + change.user.name, failures, [&] { return SetInOneCall({change}); },
+                [&] { return IsDone(change); });
+        if (failures.size() == before && change.old_name)
+            RestoreAges(ages, *change.old_name, change.user.name);
+    }
+    return failures;
+}
+
+void SetUser(const UserChange &change, const std::string &attempted)
+{
     const AgesByKey ages = ReadPasswordAges();
     TLIBErrSet(ERR_SUCCESS);
-    const int result = TAVOUserSet(old_names.data(), users.data(), static_cast<int>(users.size()));
-    Failure failure = LibraryFailure(attempted);
-    if (result != 0)
+    const bool called = SetInOneCall({change}) == 0;
+    const Failure failure = LibraryFailure(attempted);
+    if (!called || !IsDone(change))
         throw failure;
-    std::vector<std::string> refused;
-    for (const UserChange &change : changes)
-        if (!IsDone(change))
-            refused.push_back(change.user.name);
-        else if (change.old_name)
-            RestoreAges(ages, *change.old_name, change.user.name);
-    if (refused.empty())
-        return;
-    if (changes.size() > 1)
-        failure.reason = std::to_string(refused.size()) + " of " + std::to_string(changes.size()) +
-                         " were refused, the others are done: " + SomeOf(refused) + "; the last reason";
-    throw failure;
+    if (change.old_name)
+        RestoreAges(ages, *change.old_name, change.user.name);
 }
 
 bool IsSystemUser(const User &user)

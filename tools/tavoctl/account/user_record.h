@@ -2,6 +2,7 @@
 #ifndef TAVOCTL_USER_RECORD_H
 #define TAVOCTL_USER_RECORD_H
 
+#include "account/account_rules.h"
 #include "account/password_ages.h"
 #include "frame/argument_kind.h"
 #include "frame/column.h"
@@ -49,8 +50,11 @@ struct UserChange {
 };
 
 // Carries the batch through in one call of the library, and then reads every account back: the library skips an entry
-// that it refuses. Throws one Failure that names those, or the reason why nothing was changed.
-void SetUsers(const std::vector<UserChange> &changes, const std::string &attempted);
+// that it refuses. Returns those, by their (new) names. Throws a Failure when nothing was changed.
+EntryFailures SetUsers(const std::vector<UserChange> &changes, const std::string &attempted);
+
+// The same for a single account; throws a Failure also when it is refused.
+void SetUser(const UserChange &change, const std::string &attempted);
 
 // The account is one of those that the system itself needs.
 bool IsSystemUser(const User &user);

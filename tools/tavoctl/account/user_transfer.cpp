@@ -96,7 +96,7 @@ bool ChoosePassword(const AccountRow &row, const PasswordChoice *choice, const s
     return differs || !password.empty() || !change.old_name;
 }
 
-void StoreHashes(const std::vector<GivenHashes> &hashes, const std::string &attempted)
+void StoreHashes(const std::vector<GivenHashes> &hashes, const std::string &attempted, EntryFailures &failures)
 {
     std::vector<User> users;
     for (const GivenHashes &hash : hashes)
@@ -114,17 +114,19 @@ void StoreHashes(const std::vector<GivenHashes> &hashes, const std::string &atte
     }
     const int count = static_cast<int>(rows.size());
     const AgesByKey ages = ReadPasswordAges();
-    TLIBErrSet(ERR_SUCCESS);
-    const int result = count ? TAVOUserSetPasswd(rows.data(), password.data(), lm.data(), nt.data(), count) : 0;
-    Failure failure = LibraryFailure(attempted);
-    if (result != 0)
-        throw failure;
-    for (const GivenHashes &hash : hashes) {
-        if (ReadUser(hash.name).password != hash.password) {
-            failure.reason = "those of " + hash.name + " were refused";
-            throw failure;
-        }
-        RestoreAges(ages, hash.name, hash.name);
+    Must(!count || TAVOUserSetPasswd(rows.data(), password.data(), lm.data(), nt.data(), count) == 0, attempted);
+    for (std::size_t i = 0; i < hashes.size(); ++i) {
+        const GivenHashes &hash = hashes[i];
+        const auto is_stored = [&] {
+            return ReadUser(hash.name).password == hash.password;
+        };
+        const std::size_t before = failures.size();
+        if (!is_stored())
+            TryAgain(
+                hash.name, attempted + ", " + hash.name, failures,
+                [&] { return TAVOUserSetPasswd(&rows[i], &password[i], &lm[i], &nt[i], 1); }, is_stored);
+        if (failures.size() == before)
+            RestoreAges(ages, hash.name, hash.name);
     }
 }
 
@@ -151,6 +153,7 @@ UserPlan PlanUsers(Call &call, const std::string &path, bool update, const std::
         const bool differs = ChoosePassword(row, password, rows.Attempted(row), change, plan);
         const std::string object = "user " + change.user.name;
         const std::size_t before = call.report.changes.size();
+        plan.entries.push_back(change.user.name);
         const bool locked = !plan.locked.empty() && plan.locked.back() == change.user.name;
         described.password = old ? old->password : locked ? locked_hash : change.user.password;
         call.Compare(object, user_columns, old, std::optional(described));
@@ -163,23 +166,39 @@ UserPlan PlanUsers(Call &call, const std::string &path, bool update, const std::
     return plan;
 }
 
-void CarryOut(const UserPlan &plan)
+EntryFailures CarryOut(const UserPlan &plan)
 {
     const int last = LastUserId();
-    SetUsers(plan.changes, "import " + plan.path);
+    EntryFailures failures = SetUsers(plan.changes, "import " + plan.path);
+    const auto failed = [&](const std::string &name) {
+        return std::any_of(failures.begin(), failures.end(),
+                           [&](const auto &failure) { return failure.first == name; });
+    };
     std::vector<GivenHashes> hashes = plan.hashes;
     const auto samba = plan.locked.empty() ? std::map<std::string, SambaHashes>() : ReadSambaHashes();
     for (const std::string &name : plan.locked)
         if (const auto found = samba.find(AccountKey(name)); found != samba.end())
             hashes.push_back({name, locked_hash, found->second.lm, found->second.nt});
-    StoreHashes(hashes, "store the hashes of " + plan.path);
+    std::erase_if(hashes, [&](const GivenHashes &hash) { return failed(hash.name); });
+    StoreHashes(hashes, "store the hashes of " + plan.path, failures);
     for (const UserChange &change : plan.changes) {
-        if (change.old_name)
+        if (change.old_name || failed(change.user.name))
             continue;
         WarnOfName(change.user.name);
         if (change.user.uid < 0)
             WarnOfReusedId(change.user.name, ReadUser(change.user.name).uid, last);
     }
+    return failures;
+}
+
+void ThrowFirst(const EntryFailures &failures)
+{
+    if (failures.empty())
+        return;
+    Failure failure = failures.front().second;
+    if (failures.size() > 1)
+        failure.hint += (failure.hint.empty() ? "" : "; ") + std::to_string(failures.size()) + " entries were refused";
+    throw failure;
 }
 
 std::vector<User> LocalUsers()
@@ -230,8 +249,11 @@ Action UserImport(Arguments &in)
         std::vector<std::string> columns = Names(user_export_columns);
         columns.emplace_back("password");
         const UserPlan plan = PlanUsers(call, *path, *update, ParseAccountRows(ReadWhole(*path), columns), &password);
+        for (const std::string &name : plan.entries)
+            call.BeginEntry("user " + name);
         if (call.Proceed())
-            CarryOut(plan);
+            for (const auto &[name, failure] : CarryOut(plan))
+                call.FailEntry("user " + name, failure);
     };
 }
 

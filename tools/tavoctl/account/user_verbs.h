@@ -31,7 +31,7 @@ struct UserKind {
     static void RefuseId(const std::string &name, int uid) { RefuseTakenId(name, uid); }
     static void Set(const std::string &old_name, const User &user, const std::string &attempted)
     {
-        SetUsers({{.old_name = old_name, .user = user}}, attempted);
+        SetUser({.old_name = old_name, .user = user}, attempted);
     }
 };
 

@@ -1,4 +1,5 @@
 // How a verb answers and asks.
+#include "frame/error_codes.h"
 #include "frame/failure.h"
 #include "frame/table.h"
 #include "frame/terminal.h"
@@ -50,6 +51,27 @@ void Call::Change(const std::string &object, const std::string &column, const Ce
 {
     if (!(before == after))
         report.changes.push_back({object, column, before, after});
+}
+
+void Call::BeginEntry(const std::string &object)
+{
+    report.entries->push_back({.object = object, .result = {}, .code = {}, .name = {}});
+}
+
+void Call::FailEntry(const std::string &object, const Failure &failure)
+{
+    for (Entry &entry : *report.entries)
+        if (entry.object == object) {
+            entry.result = "failed";
+            if (failure.code) {
+                entry.code = Hexadecimal(failure.code);
+                entry.name = ErrorName(failure.code);
+            }
+        }
+    std::erase_if(report.changes, [&](const tavoctl::Change &change) { return change.object == object; });
+    std::cerr << (json ? failure.Json() : failure.Text(verbose)) + "\n";
+    if (status == exit_done)
+        status = failure.Status();
 }
 
 bool Call::Proceed(const std::string &question) const

@@ -249,6 +249,8 @@ int Program::RunVerb(const Family &family, const VerbEntry &entry, std::vector<s
         if (verb.Output())
             call.style.columns = ChosenColumns(*verb.Output(), entry.answer.columns);
         RefuseWithoutRights(entry, call);
+        if (entry.answer.has_entries)
+            call.report.entries.emplace();
         TLIBErrSet(ERR_SUCCESS);
         verb.Run()(call);
         if (entry.ReportsChanges() && (call.json || call.dry_run))

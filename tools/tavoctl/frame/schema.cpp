@@ -86,12 +86,17 @@ Json ListOf(const std::vector<ColumnFacts> &columns, Details details = Details::
     return ObjectOf({}, Details::all, std::move(properties));
 }
 
-Json ChangeSchema()
+Json ChangeSchema(bool has_entries)
 {
     Json properties = Version();
     properties["changed"] = {{"type", "boolean"}};
     properties["changes"] = {{"type", "array"},
                              {"items", ObjectOf(Facts(change_columns), Details::all, Json::object())}};
+    if (has_entries) {
+        Json entry = ObjectOf(Facts(entry_columns), Details::all, Json::object());
+        entry["properties"]["result"]["enum"] = {"done", "planned", "unchanged", "failed"};
+        properties["entries"] = {{"type", "array"}, {"items", std::move(entry)}};
+    }
     Json schema = ObjectOf({}, Details::all, std::move(properties));
     schema["properties"]["dry_run"] = {{"const", true}};
     schema["properties"]["diff"] = {{"type", "string"}, {"description", "of the file that the verb edits"}};
@@ -133,7 +138,7 @@ Json SchemaOf(const Answer &answer)
     case Answer::document:
         return ListOf(answer.columns, Details::some);
     case Answer::change:
-        return ChangeSchema();
+        return ChangeSchema(answer.has_entries);
     case Answer::own:
         return Json::parse(answer.schema());
     default:
@@ -178,7 +183,7 @@ std::string FormText(const Answer &answer)
     case Answer::document:
         return "items: " + fields;
     case Answer::change:
-        return "changes";
+        return answer.has_entries ? "changes, entries" : "changes";
     case Answer::own:
         return std::string("[a document](") + answer.page + ")";
     default:

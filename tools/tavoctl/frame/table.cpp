@@ -311,9 +311,27 @@ std::string ChangeReport::Json() const
                         {"old", ToJson(change.before)},
                         {"new", ToJson(change.after)}});
     document["changes"] = std::move(list);
+    if (entries) {
+        auto results = nlohmann::ordered_json::array();
+        for (const Entry &entry : *entries)
+            results.push_back({{"object", entry.object},
+                               {"result", ResultOf(entry)},
+                               {"code", ToJson(entry.code)},
+                               {"name", ToJson(entry.name)}});
+        document["entries"] = std::move(results);
+    }
     if (!diff.empty())
         document["diff"] = diff;
     return Dump(document);
+}
+
+std::string ChangeReport::ResultOf(const Entry &entry) const
+{
+    if (!entry.result.empty())
+        return entry.result;
+    const bool differs = std::any_of(changes.begin(), changes.end(),
+                                     [&](const Change &change) { return change.object == entry.object; });
+    return !differs ? "unchanged" : dry_run ? "planned" : "done";
 }
 
 }  // namespace tavoctl

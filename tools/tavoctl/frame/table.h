@@ -5,6 +5,7 @@
 
 #include "frame/column.h"
 
+#include <optional>
 #include <string>
 #include <utility>
 #include <vector>
@@ -72,8 +73,23 @@ inline constexpr Column<Change> change_columns[] = {
     {"new", field<&Change::after>, "null where there is none any more"},
 };
 
+// One entry of a batch.
+struct Entry {
+    std::string object;
+    std::string result;                     // "done", "planned" by a dry run, "unchanged", "failed"
+    std::optional<std::string> code, name;  // of the library, for a failure
+};
+
+inline constexpr Column<Entry> entry_columns[] = {
+    {"object", field<&Entry::object>, "what the entry is about"},
+    {"result", field<&Entry::result>, "done, planned (in a dry run), unchanged, or failed"},
+    {"code", field<&Entry::code>, "of a failure of the library"},
+    {"name", field<&Entry::name>, "of that code"},
+};
+
 struct ChangeReport {
     std::vector<Change> changes;
+    std::optional<std::vector<Entry>> entries = {};    // of a batch, in its order; a result is set for failures alone
     std::vector<std::pair<std::string, Cell>> chosen;  // ids and the like
     std::string diff;                                  // of the one file that was edited
     bool dry_run;
@@ -81,6 +97,9 @@ struct ChangeReport {
     bool Changed() const { return !changes.empty() || !diff.empty(); }
     std::string Text() const;
     std::string Json() const;
+
+  private:
+    std::string ResultOf(const Entry &entry) const;
 };
 
 }  // namespace tavoctl

@@ -47,6 +47,7 @@ struct Answer {
     std::vector<ColumnFacts> or_one = {};  // a list verb that can also show one thing
     std::string (*schema)() = nullptr;     // of a JSON document of the verb's own
     const char *page = "";                 // of the manual that describes it
+    bool has_entries = false;              // a change that says what became of each entry of a batch
 
     template <class Facts_, std::size_t Count>
     static Answer One(const Column<Facts_> (&columns)[Count])
@@ -71,8 +72,12 @@ struct Answer {
     }
     static Answer Own(std::string (*schema)(), const char *page) { return {own, {}, {}, schema, page}; }
     static Answer Change() { return {change, {}, {}}; }
+    // A change of several things, each with its own result.
+    static Answer Batch() { return {.form = change, .has_entries = true}; }
     static Answer Nothing() { return {nothing, {}, {}}; }
 };
+
+struct Failure;
 
 // How the verb was called: the common options, and how it answers.
 struct Call {
@@ -130,6 +135,11 @@ struct Call {
                        after ? column.read(*after) : Cell());
     }
     void Change(const std::string &object, const std::string &column, const Cell &before, const Cell &after);
+    // An entry of a batch, whose result the JSON tells. One that fails does not keep the others from being done: its
+    // changes go, its failure has a line on standard error, and the first failure is the exit status.
+    void BeginEntry(const std::string &object);
+    void FailEntry(const std::string &object, const Failure &failure);
+
     // Records a chosen value, such as an id; a field of the JSON beside "changed".
     void Tell(const std::string &name, const Cell &value) { report.chosen.emplace_back(name, value); }
 

@@ -244,9 +244,9 @@ void StatePlan::SetAccounts() const
     AccountFiles files(users_);
     try {
         if (!users_.changes.empty())
-            tavoctl::CarryOut(users_);
+            ThrowFirst(tavoctl::CarryOut(users_));
         if (!groups_.changes.empty())
-            tavoctl::CarryOut(groups_);
+            ThrowFirst(tavoctl::CarryOut(groups_));
     } catch (Failure &failure) {
         files.PutBack();
         failure.hint += std::string(failure.hint.empty() ? "" : "; ") + "the accounts are as they were";
