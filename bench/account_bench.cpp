@@ -1,4 +1,5 @@
-// Adding users in batches, and setting hashes that are there already, against Debian's own tools.
+// Adding users in batches, and setting hashes that are there already, against Debian's own tools; and how long a user with
+// a large home folder keeps others waiting while it is deleted.
 // Changes the accounts of the root that it runs in.
 #include "tavo_user.h"
 
@@ -14,6 +15,9 @@
 #include <functional>
 #include <sstream>
 
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 namespace {
@@ -122,6 +126,56 @@ void Measure(const std::string &name, double share, const std::function<void()> 
         ->Unit(benchmark::kMillisecond);
 }
 
+// The seconds from the call to the moment at which another process gets the lock of the accounts.
+double HeldWhileDeleted(const fs::path &home)
+{
+    const std::string name = home.filename();
+    const int lock = ::open("/tmp/lock/lock_pw", O_RDONLY | O_CLOEXEC);
+    if (lock < 0)
+        GiveUp("there is no lock");
+    const auto begin = std::chrono::steady_clock::now();
+    const pid_t child = ::fork();
+    if (child == 0) {
+        const char *const names[] = {name.c_str()};
+        ::_exit(TAVOUserDelete(names, 1) == 0 ? 0 : 1);
+    }
+    // The folder is put aside under the lock.
+    siginfo_t ended = {};
+    while (fs::exists(home) && ::waitid(P_PID, static_cast<id_t>(child), &ended, WEXITED | WNOHANG | WNOWAIT) == 0 &&
+           ended.si_pid == 0)
+        ::usleep(100);
+    ::flock(lock, LOCK_EX);
+    const double held = std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();
+    ::close(lock);
+    int status = 0;
+    if (::waitpid(child, &status, 0) != child || status != 0)
+        GiveUp("the user cannot be deleted");
+    return held;
+}
+
+// How long the locks are held, in a row of its own: what takes long comes after them.
+void MeasureLargeHome()
+{
+    constexpr int file_count = 150000;
+    benchmark::RegisterBenchmark(("locks_held_deleting_home/" + std::to_string(file_count) + "/tavo").c_str(),
+                                 [](benchmark::State &state) {
+                                     for ([[maybe_unused]] auto round : state) {
+                                         Restore();
+                                         Batch(kThere, 1).Add();
+                                         const fs::path home = "/volume1/homes/user" + std::to_string(kThere);
+                                         fs::create_directories(home);
+                                         for (int i = 0; i < file_count; ++i)
+                                             std::fclose(std::fopen((home / std::to_string(i)).c_str(), "w"));
+                                         state.SetIterationTime(HeldWhileDeleted(home));
+                                         if (fs::exists(home))
+                                             GiveUp("the home is still there");
+                                     }
+                                 })
+        ->UseManualTime()
+        ->Iterations(1)
+        ->Unit(benchmark::kMillisecond);
+}
+
 void WriteLists()
 {
     std::ofstream clear("/tmp/newusers");
@@ -164,6 +218,9 @@ int main(int argc, char **argv)
             for (int i = kThere; i < kThere + kSample; ++i)
                 Run("/usr/sbin/useradd -M -N -g 100 -p '" + std::string(hash) + "' user" + std::to_string(i));
         });
+
+    std::ofstream("/usr/tavo/etc/share.conf") << "[homes]\npath=/volume1/homes\n";
+    MeasureLargeHome();
 
     return bench::Run(argc, argv);
 }

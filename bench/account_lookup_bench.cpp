@@ -1,4 +1,5 @@
-// Looking up one user of 2,000 by name, with its lock, against the C library's readers of the files.
+// Looking up one user of 2,000 by name, with its lock, against the C library's readers of the files; and, as root and
+// without root, whether there is one.
 // Changes the accounts of the root that it runs in.
 #include "tavo_user.h"
 
@@ -6,9 +7,11 @@
 
 #include <cstdio>
 #include <cstdlib>
+#include <cstring>
 
 #include <pwd.h>
 #include <shadow.h>
+#include <unistd.h>
 
 namespace {
 
@@ -48,6 +51,30 @@ uint64_t Getpwnam()
     return user ? uint64_t{user->pw_uid} : 0;
 }
 
+uint64_t IsThere()
+{
+    const char *const names[] = {wanted, nullptr};
+    char found[sizeof wanted];
+    const int length = TAVOUserGetValidUserList(names, found, sizeof found);
+    return length > 0 ? static_cast<uint64_t>(length) : 0;
+}
+
+uint64_t LengthOfName()
+{
+    const passwd *user = ::getpwnam(wanted);
+    return user ? std::strlen(user->pw_name) + 1 : 0;
+}
+
+// The work as a program of a user without rights does it: from the text files, without lock and stores.
+uint64_t WithoutRoot(uint64_t (*work)())
+{
+    constexpr uid_t nobody = 65534;
+    if (::seteuid(nobody) != 0)
+        return 0;
+    const uint64_t result = work();
+    return ::seteuid(0) == 0 ? result : 0;
+}
+
 }  // namespace
 
 int main(int argc, char **argv)
@@ -60,5 +87,14 @@ int main(int argc, char **argv)
                    {{"tavo", Tavo}, {"getpwnam", Getpwnam}, {"getpwnam+getspnam", [] {
                                                                  return ::getspnam(wanted) ? Getpwnam() : 0;
                                                              }}});
+    bench::Compare("user_is_there", kUsers, {{"tavo", IsThere}, {"getpwnam", LengthOfName}});
+    bench::Compare("the_same_without_root", kUsers,
+                   {{"tavo",
+                     [] {
+                         return WithoutRoot(IsThere);
+                     }},
+                    {"getpwnam", [] {
+                         return WithoutRoot(LengthOfName);
+                     }}});
     return bench::Run(argc, argv);
 }
