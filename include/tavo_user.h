@@ -13,12 +13,18 @@
  *
  * Adding, changing and deleting need root. They hold the password, group and Samba locks exclusively (tavo_lock.h) and
  * the system's own lock on the password files (lckpwdf), a password change the password lock and the system's own,
- * reading the password lock shared; each waits at most 5 seconds. Do not call them with lckpwdf held.
+ * reading the password lock shared; each waits at most 5 seconds. Do not call them with lckpwdf held. After a change the
+ * caches of nscd and sssd are flushed where these daemons run.
  *
  * Unless said otherwise a function returns 0 or a count, or -1 with the code set. Any of them may fail with
- *   ERR_OUT_OF_MEMORY  no memory
- *   ERR_LOCK_FAILED    a lock was not free within 5 seconds
- *   ERR_OPEN_FAILED    the account cache database cannot be opened or rebuilt
+ *   ERR_OUT_OF_MEMORY     no memory
+ *   ERR_LOCK_FAILED       a lock was not free within 5 seconds
+ *   ERR_OPEN_FAILED       the account cache database cannot be opened or rebuilt
+ *   ERR_READ_FAILED       a text file, or the record of an unfinished change, cannot be read
+ *   ERR_NOT_ENOUGH_SPACE  the database cannot be rebuilt: /tmp is full
+ *   ERR_RENAME_FAILED     an unfinished change cannot be completed: a file cannot be moved into place
+ *   ERR_DB_CURSOR, ERR_DISK_IO_FAILED, ERR_DB_INTERRUPTED  the database cannot be read
+ *   ERR_ACCESS_DENIED     a program without root may not read the text file that has the answer
  * and then nothing has changed.
  */
 #ifndef TAVO_USER_H
@@ -192,7 +198,7 @@ TAVO_API int TAVOUserGetValidUserList(const char *const *rgszName, char *szBuf, 
  * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*, /etc/group,
  *   /usr/tavo/etc/smb.conf, /usr/tavo/etc/share.conf, /usr/tavo/etc/afpd.conf, /etc/ftpchroot,
  *   /etc/.tavoaccount.commit
- * Runs: /bin/mv
+ * Runs: /bin/mv, /usr/sbin/nscd, /usr/sbin/sss_cache
  * Locks: TAVO_LOCK_USER (exclusive, at most 5 s), TAVO_LOCK_GROUP (exclusive), TAVO_LOCK_SMB (exclusive) */
 TAVO_API int TAVOUserSet(const char *const *rgszOldName, const TAVOUSER *const *rgpUser, int nUser);
 
@@ -201,7 +207,7 @@ TAVO_API int TAVOUserSet(const char *const *rgszOldName, const TAVOUSER *const *
  * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*, /etc/group,
  *   /usr/tavo/etc/smb.conf, /usr/tavo/etc/share.conf, /usr/tavo/etc/afpd.conf, /etc/ftpchroot,
  *   /etc/.tavoaccount.commit
- * Runs: /bin/mv
+ * Runs: /bin/mv, /usr/sbin/nscd, /usr/sbin/sss_cache
  * Locks: TAVO_LOCK_USER (exclusive, at most 5 s), TAVO_LOCK_GROUP (exclusive), TAVO_LOCK_SMB (exclusive) */
 TAVO_API int TAVOUserSetOne(const char *szOldName, const TAVOUSER *pUser);
 
@@ -211,6 +217,7 @@ TAVO_API int TAVOUserSetOne(const char *szOldName, const TAVOUSER *pUser);
  * Returns 0, or -1 with ERR_BAD_PARAMETERS (an array is NULL, nUser is negative) or as TAVOUserSet.
  * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*,
  *   /etc/.tavoaccount.commit
+ * Runs: /usr/sbin/nscd, /usr/sbin/sss_cache
  * Locks: TAVO_LOCK_USER (exclusive, at most 5 s) */
 TAVO_API int TAVOUserSetPasswd(const TAVOUSER *const *rgpUser, const char *const *rgszHash,
                                const char *const *rgszLmHash, const char *const *rgszNtHash, int nUser);
@@ -228,6 +235,7 @@ TAVO_API int TAVOUserSetPasswd(const TAVOUSER *const *rgpUser, const char *const
  * or as TAVOUserSet.
  * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*,
  *   /etc/.tavoaccount.commit
+ * Runs: /usr/sbin/nscd, /usr/sbin/sss_cache
  * Locks: TAVO_LOCK_USER (exclusive, at most 5 s) */
 TAVO_API int TAVOUserLockSet(const char *szName, int fLocked);
 
@@ -241,6 +249,7 @@ TAVO_API int TAVOUserLockSet(const char *szName, int fLocked);
  * or as TAVOUserLockSet.
  * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*,
  *   /etc/.tavoaccount.commit
+ * Runs: /usr/sbin/nscd, /usr/sbin/sss_cache
  * Locks: TAVO_LOCK_USER (exclusive, at most 5 s) */
 TAVO_API int TAVOUserAgingSet(const char *szName, int nMin, int nMax, int nWarn);
 
@@ -250,7 +259,7 @@ TAVO_API int TAVOUserAgingSet(const char *szName, int nMin, int nMax, int nWarn)
  * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*, /etc/group,
  *   /usr/tavo/etc/smb.conf, /usr/tavo/etc/share.conf, /usr/tavo/etc/afpd.conf, /etc/ftpchroot,
  *   /etc/.tavoaccount.commit
- * Runs: /usr/bin/smbstatus, /usr/bin/smbcontrol
+ * Runs: /usr/bin/smbstatus, /usr/bin/smbcontrol, /usr/sbin/nscd, /usr/sbin/sss_cache
  * Locks: TAVO_LOCK_USER (exclusive, at most 5 s), TAVO_LOCK_GROUP (exclusive), TAVO_LOCK_SMB (exclusive) */
 TAVO_API int TAVOUserDelete(const char *const *rgszName, int nUser);
 
@@ -321,7 +330,8 @@ TAVO_API int TAVOUserDBSet(TAVOUSERDB *pDb, const char *szOldName, const TAVOUSE
  *   ERR_NOT_ENOUGH_SPACE  the disk is full
  *   ERR_RENAME_FAILED     a file cannot be moved into place
  * Files: /etc/passwd, /etc/shadow, /etc/tavouser.conf, /usr/tavo/etc/private/smbpasswd, /tmp/.db.user.*,
- *   /etc/.tavoaccount.commit */
+ *   /etc/.tavoaccount.commit
+ * Runs: /usr/sbin/nscd, /usr/sbin/sss_cache */
 TAVO_API int TAVOUserDBDump(TAVOUSERDB *pDb);
 
 /* Removes the temporary files beside the four. Returns 0, or -1 with ERR_REMOVE_FAILED.

@@ -1,8 +1,6 @@
 // One locked use of the stores of an account family.
 #include "account/detail/account_session.h"
 
-#include "tavo_lock.h"
-
 #include "account/detail/family_dump.h"
 #include "account/detail/store_seal.h"
 #include "core/detail/extras.h"
@@ -26,7 +24,7 @@ constexpr int kLockSeconds = 5;
 AccountSession::~AccountSession()
 {
     KeepErrno keep;
-    const KeepFault keep_fault;
+    const KeepFault keep_fault;  // of closing the stores, too
     stores_.clear();
     Unlock();
 }
@@ -137,6 +135,7 @@ int AccountSession::SealWritten()
 
 bool AccountSession::Unlock()
 {
+    const KeepFault keep;  // the caller decides whether that is a failure
     system_.Release();
     return locks_ == 0 || ErrTLIBFileUnlock(std::exchange(locks_, 0)) == 0;
 }

@@ -7,6 +7,7 @@
 #include "account/detail/store_build.h"
 #include "account/detail/system_lock.h"
 #include "account/detail/text_stores.h"
+#include "tavo_lock.h"
 
 #include <memory>
 #include <span>
@@ -16,6 +17,9 @@
 #include <unistd.h>
 
 namespace tavo {
+
+// What a change needs that may touch everything that knows accounts.
+inline constexpr unsigned kAccountLocks = TAVO_LOCK_USER | TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
 
 class AccountSession {
   public:

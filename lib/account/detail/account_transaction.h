@@ -5,14 +5,11 @@
 
 #include "account/detail/account_commit.h"
 #include "account/detail/account_session.h"
-#include "account/detail/follow_up_log.h"
-#include "account/detail/neighbour_files.h"
-#include "account/detail/user_homes.h"
+#include "account/detail/home_changes.h"
+#include "account/detail/neighbour_changes.h"
 
 #include <functional>
-#include <memory>
 #include <string>
-#include <vector>
 
 namespace tavo {
 
@@ -20,7 +17,7 @@ class AccountTransaction {
   public:
     // Failures of the following steps, including those of earlier changes, are logged at `where`.
     explicit AccountTransaction(const AccountKind &kind, Where where = Where())
-        : kind_(kind), where_(where), session_(kind)
+        : session_(kind), neighbours_(commit_, where), homes_(commit_, kind, where)
     {
     }
     AccountTransaction(const AccountTransaction &) = delete;
@@ -38,14 +35,10 @@ class AccountTransaction {
 
     // The planned steps of the change. `targets` of a step: the files that contain the name.
     AccountCommit &Files() { return commit_; }
-    NetBackupUsers &Backup()
-    {
-        backup_is_set_ = true;
-        return backup_;
-    }
+    NetBackupUsers &Backup() { return neighbours_.Backup(); }
 
     // Composes the neighbours' files for the steps in Files(). Files that cannot be composed are pending.
-    void Compose();
+    void Compose() { neighbours_.Compose(); }
 
     // Composes the account files by `compose` from stores into which everything is merged that others have changed in
     // the files meanwhile. Its code; after some rounds ERR_RENAME_FAILED.
@@ -54,27 +47,18 @@ class AccountTransaction {
     // Everything at once, then the home folders. A code of AccountCommit::Commit. From 0 on nothing fails any more.
     int Commit();
 
-    // Releases the locks, then does the slow steps: removes and copies folders. Returns false when a lock could not be
-    // released.
+    // Releases the locks; then, after a commit, flushes the caches of the system's look-ups, and removes and copies folders.
+    // Returns false when a lock could not be released.
     bool End();
 
   private:
     void FinishEarlier();
-    int ComposeMembers(const std::vector<NameStep> &steps);
-    void ComposeOne(unsigned target);
-    void SealGroups();
-    void TakeHomeSteps();
-    void DoWhatTakesTime();
-    void ForgetDone(const std::vector<std::string> &stages, const std::vector<HomeStep> &moved);
 
-    const AccountKind &kind_;
-    const Where where_;
     AccountSession session_;
     AccountCommit commit_;
-    NetBackupUsers backup_;
-    bool backup_is_set_ = false;              // with passwords, which no step has
-    std::unique_ptr<AccountSession> groups_;  // when a change of users touches groups
-    std::vector<HomeStep> elsewhere_;
+    NeighbourChanges neighbours_;
+    HomeChanges homes_;
+    bool committed_ = false;
 };
 
 }  // namespace tavo

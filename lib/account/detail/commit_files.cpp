@@ -31,7 +31,7 @@ bool SyncFolder(std::string_view folder) noexcept
 
 Fd CreateTemporary(const char *path, bool makes_folder)
 {
-    constexpr int flags = O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW;
+    constexpr int flags = O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW;  // Samba's file is read again
     ::unlink(path);
     Fd fd = OpenFd(path, flags, 0600);
     if (fd || errno != ENOENT || !makes_folder)

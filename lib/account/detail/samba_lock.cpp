@@ -1,11 +1,13 @@
 // The lock that Samba's own programs take on its password file.
 #include "account/detail/samba_lock.h"
 
+#include "account/detail/samba_latecomers.h"
 #include "account/detail/store_family.h"
 #include "core/detail/open_file.h"
 #include "tavo_error.h"
 
 #include <ctime>
+#include <new>
 
 namespace tavo {
 namespace {
@@ -61,6 +63,11 @@ void SambaLock::TakeNew(int fd) noexcept
 
 void SambaLock::Release() noexcept
 {
+    try {
+        if (old_ && new_ && HasTheName(new_.Get(), kUserTextRows[kSmbText].path))
+            CarryOverLateLines(old_.Get(), new_.Get());
+    } catch (const std::bad_alloc &) {
+    }
     old_.Reset();
     new_.Reset();
 }

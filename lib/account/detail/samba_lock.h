@@ -19,6 +19,7 @@ class SambaLock {
     // Locks the new file before it gets the name, so that it does not change until its time stamps are recorded.
     void TakeNew(int fd) noexcept;
 
+    // After a replacement the programs that waited for the old file finish first.
     void Release() noexcept;
 
   private:

@@ -3,7 +3,6 @@
 #define TAVO_ACCOUNT_DETAIL_USER_BATCH_H
 
 #include "account/detail/user_accounts.h"
-#include "tavo_lock.h"
 
 #include <functional>
 #include <set>
@@ -13,8 +12,7 @@
 
 namespace tavo {
 
-// The locks for adding, changing and deleting users, and the signals afterwards.
-inline constexpr unsigned kUserChangeLocks = TAVO_LOCK_USER | TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
+// Signals after a change.
 inline constexpr int kReadAccountsAgain = 10;  // for the download scheduler
 inline constexpr int kAccountsChanged = 47;    // for the event daemon
 

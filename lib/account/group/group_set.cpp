@@ -8,11 +8,8 @@
 #include "account/detail/group_texts.h"
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
-#include "tavo_lock.h"
 
 namespace {
-
-constexpr unsigned kLocksOfSet = TAVO_LOCK_USER | TAVO_LOCK_GROUP | TAVO_LOCK_SMB;
 
 int Apply(tavo::AccountTransaction &transaction, const char *old_name, const TAVOGROUP &group,
           tavo::GroupChange &change)
@@ -45,7 +42,7 @@ extern "C" int TAVOGroupSet(const char *szOldName, const TAVOGROUP *pGroup)
             return Fail(ERR_INVALID_GROUPNAME);
         }
         tavo::AccountTransaction transaction(tavo::kGroupKind);
-        if (const int code = transaction.Begin(kLocksOfSet))
+        if (const int code = transaction.Begin(tavo::kAccountLocks))
             return Fail(code);
         tavo::GroupChange change;
         int code = Apply(transaction, szOldName, *pGroup, change);

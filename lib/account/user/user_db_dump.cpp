@@ -4,6 +4,7 @@
 #include "account/detail/account_transaction.h"
 #include "account/detail/commit_resume.h"
 #include "account/detail/family_dump.h"
+#include "account/detail/name_caches.h"
 #include "account/detail/user_accounts.h"
 #include "account/detail/user_dump.h"
 #include "core/detail/guard.h"
@@ -90,7 +91,9 @@ extern "C" int TAVOUserDBDump(TAVOUSERDB *pDb)
             return FailUserDump(code, report);
         LogDropped(report);
         RecordTimes(*pDb);
+        commit.Samba().Release();
         commit.Settle();
+        tavo::FlushNameCaches();
         return 0;
     });
 }

@@ -12,7 +12,6 @@
 #include "core/detail/log.h"
 #include "core/detail/setting_switch.h"
 #include "tavo_appliance.h"
-#include "tavo_lock.h"
 #include "tavo_quota.h"
 
 #include <set>
@@ -75,7 +74,7 @@ void TellServices(const std::vector<Doomed> &doomed)
     if (tavo::ReadSetting(tavo::kFactorySettings, "support_download", "yes").value_or(false) &&
         TAVOSchedulerHup(tavo::kReadAccountsAgain) != 0)
         LogError("%s:%d Failed to signal scheduled.");
-    if (tavo::ReadSetting(tavo::kSettings, "runsamba", "yes").value_or(false))
+    if (tavo::ReadSetting(tavo::kSettings, "runsamba", "yes").value_or(true))
         for (const Doomed &user : doomed)
             tavo::EndSmbConnections(user.name);
 }
@@ -109,7 +108,7 @@ extern "C" int TAVOUserDelete(const char *const *rgszName, int nUser)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         tavo::AccountTransaction change(tavo::kUserKind);
-        if (const int code = change.Begin(tavo::kUserChangeLocks))
+        if (const int code = change.Begin(tavo::kAccountLocks))
             return Fail(code);
         TAVOUSERDB db = tavo::UserDb(change.Session());
         const std::vector<Doomed> doomed = Collect(db, rgszName, nUser);

@@ -9,7 +9,6 @@
 #include "core/detail/log.h"
 #include "core/detail/setting_switch.h"
 #include "tavo_appliance.h"
-#include "tavo_lock.h"
 
 #include <strings.h>
 
@@ -38,7 +37,8 @@ void SetCredentials(const std::vector<tavo::DoneUser> &done, tavo::NetBackupUser
 // The other parts of the appliance that know these users.
 void PlanFollowUp(const std::vector<tavo::DoneUser> &done, tavo::AccountTransaction &change)
 {
-    const bool has_backup = tavo::ReadSetting(tavo::kFactorySettings, "netbkp", "yes").value_or(false);
+    // Where that cannot be read: only names that stand in the service's files are changed there.
+    const bool has_backup = tavo::ReadSetting(tavo::kFactorySettings, "netbkp", "yes").value_or(true);
     tavo::Marker &steps = change.Files().Steps();
     const unsigned targets =
         tavo::kSambaLists | tavo::kMemberLists | tavo::kFtpList | (has_backup ? unsigned{tavo::kBackupUsers} : 0);
@@ -80,7 +80,7 @@ extern "C" int TAVOUserSet(const char *const *rgszOldName, const TAVOUSER *const
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         tavo::AccountTransaction change(tavo::kUserKind);
-        if (const int code = change.Begin(tavo::kUserChangeLocks))
+        if (const int code = change.Begin(tavo::kAccountLocks))
             return Fail(code);
         TAVOUSERDB db = tavo::UserDb(change.Session());
         tavo::UserBatch batch(db, [&](const std::string &key) { return change.IsPending(false, key); });

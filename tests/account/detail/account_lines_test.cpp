@@ -6,6 +6,7 @@
 #include "account/detail/misc_line.h"
 #include "account/detail/passwd_line.h"
 #include "account/detail/password_hash.h"
+#include "account/detail/samba_latecomers.h"
 #include "account/detail/shadow_line.h"
 #include "account/detail/smbpasswd_line.h"
 #include "account/detail/user_texts.h"
@@ -198,6 +199,30 @@ TEST(UserTexts, ForeignFilesKeepTheirAccounts)
     const auto unmarked = tavo::UserStoreEntries({.passwd = "a:x:1050:1:::\nb:x:3073:1:::\nc:x:1040:1:::\n"});
     EXPECT_EQ(unmarked[tavo::kUidStore].at("#CURRENT_UID"), tavo::NumberBytes(1050)) << "the highest in range";
     EXPECT_EQ(tavo::UserStoreEntries({})[tavo::kUidStore].at("#CURRENT_UID"), tavo::NumberBytes(1023));
+}
+
+// What one of Samba's programs wrote into a file that had just been replaced.
+TEST(SambaLatecomers, LinesThatDifferAreCarriedOver)
+{
+    const std::string before = "# comment\na:1:L:N:[U]:T:\nb:2:L:N:[U]:T:\nc:3:L:N:[U]:T:\n";
+    const struct {
+        const char *name;
+        std::string now;
+        std::string after;
+        std::string expected;
+    } rows[] = {
+        {"a hash", before, "# comment\na:1:L:N:[U]:T:\nb:2:X:Y:[U]:Z:\nc:3:L:N:[U]:T:\n",
+         "# comment\na:1:L:N:[U]:T:\nb:2:X:Y:[U]:Z:\nc:3:L:N:[U]:T:\n"},
+        {"of one who has another name now", "r:2:L:N:[U]:T:\nb:4:L:N:[U]:T:\n",
+         "a:1:L:N:[U]:T:\nc:3:L:N:[U]:T:\nb:2:X:Y:[U]:Z:\n", "r:2:X:Y:[U]:Z:\nb:4:L:N:[U]:T:\n"},
+        {"of one who is gone", "c:3:L:N:[U]:T:\n", "b:2:X:Y:[U]:Z:\n", "c:3:L:N:[U]:T:\n"},
+        {"a new account", "a:1:L:N:[U]:T:\n", before + "d:5:L:N:[U]:T:\n", "a:1:L:N:[U]:T:\nd:5:L:N:[U]:T:\n"},
+        {"what the change wrote stays", "a:1:P:Q:[U]:V:\nb:2:L:N:[U]:T:\n",
+         "a:1:L:N:[U]:T:\nb:2:L:N:[D]:T:\nc:3:L:N:[U]:T:\n", "a:1:P:Q:[U]:V:\nb:2:L:N:[D]:T:\n"},
+        {"a torn line", "a:1:L:N:[U]:T:\n", "a:1:L:N:[U]:T:\nb\n\n", "a:1:L:N:[U]:T:\n"},
+    };
+    for (const auto &row : rows)
+        EXPECT_EQ(tavo::WithLateLines(row.now, before, row.after), row.expected) << row.name;
 }
 
 }  // namespace

@@ -5,6 +5,8 @@
 #include "account/user/user_fixture.h"
 #include "support/captured_log.h"
 #include "support/fault_state.h"
+#include "support/scenario.h"
+#include "tavo_group.h"
 
 #include <gtest/gtest.h>
 
@@ -569,6 +571,35 @@ TEST(UserFollowUp, LocksAreFreeWhileAHomeIsRemoved)
         EXPECT_NE(::access("/volume1/homes/alice", F_OK), 0);
     }
     EXPECT_TRUE(free_meanwhile);
+}
+
+// A process of the test's is the daemon; where none runs, no tool is started.
+TEST(UserFollowUp, CachesOfTheSystemsLookUpsAreFlushed)
+{
+    const auto start = [](const char *pid_file) {
+        std::filesystem::create_directories(std::filesystem::path(pid_file).parent_path());
+        test::WriteFile(pid_file, std::to_string(::getpid()) + "\n");
+    };
+    {
+        const test::Scenario none;
+        ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
+    }
+    start("/var/run/nscd/nscd.pid");
+    {
+        test::Scenario scenario;
+        scenario.Expect({"/usr/sbin/nscd", "-i", "passwd"}).Times(2);
+        scenario.Expect({"/usr/sbin/nscd", "-i", "group"}).Times(2).Exits(1);
+        scenario.InAnyOrder();
+        EXPECT_EQ(TAVOUserLockSet("alice", 1), 0);
+        EXPECT_EQ(TAVOUserLockSet("alice", 1), 0);  // changes nothing
+        EXPECT_EQ(TAVOGroupDescSet("users", "all of us"), 0);
+        EXPECT_EQ(test::DeleteUser("ghost"), ERR_NO_SUCH_USER);
+    }
+    std::filesystem::remove("/var/run/nscd/nscd.pid");
+    start("/var/run/sssd.pid");
+    test::Scenario scenario;
+    scenario.Expect({"/usr/sbin/sss_cache", "-U", "-G"});
+    EXPECT_EQ(test::DeleteUser("alice"), 0);
 }
 
 TEST(UserSetPasswd, StoresOnlyWhatIsAHash)
