@@ -371,7 +371,7 @@ TAVO_API int TAVONetLinkAggrOptSlsaveAdd(TAVONETLINKAGGR *pAggr, const char *szI
  * Returns 0, or -1 with ERR_BAD_PARAMETERS, ERR_LINK_AGGR_TYPE (szBond is an interface but not a bond),
  * ERR_LOCK_FAILED,
  * ERR_READ_FAILED or ERR_WRITE_FAILED (the files are unchanged, and the network is started) or ERR_OP_FAILURE (the
- * network did not start; the old files are back, and the old network was started).
+ * network could not be stopped or did not start; the old files are back, and the old network was started).
  * Files: /etc/sysconfig/network-scripts, /etc/network.undo
  * Runs: /etc/rc.network, /bin/cp, /bin/mv
  * Locks: TAVO_LOCK_HOST (exclusive, at most 5 s) */

@@ -54,7 +54,7 @@ def call(name: str, *arguments: Any, fails: Callable[[Any], bool] | None = None)
     """Calls the function and raises Error when it fails: when it returns a negative number or NULL, or as `fails` says."""
     with one_call:
         lib.TLIBErrSet(0)
-        result = getattr(lib, name)(*[to_c(argument) for argument in arguments])
+        result = getattr(lib, name)(*map(to_c, arguments))
         if fails is None:
             failed = result == ffi.NULL if isinstance(result, ffi.CData) else result is not None and result < 0
         else:
@@ -72,15 +72,19 @@ def below_one(result: int) -> bool:
 def ask(name: str, *arguments: Any) -> Any:
     """The result of a function that cannot fail, or whose result says all."""
     with one_call:
-        return getattr(lib, name)(*[to_c(argument) for argument in arguments])
+        return getattr(lib, name)(*map(to_c, arguments))
 
 
 def quietly(name: str, *arguments: Any) -> tuple[Any, Error | None]:
     """The result of a function and what it recorded, without judging either."""
     with one_call:
         lib.TLIBErrSet(0)
-        result = getattr(lib, name)(*[to_c(argument) for argument in arguments])
+        result = getattr(lib, name)(*map(to_c, arguments))
         return result, failure(name) if lib.tavoerrno else None
+
+
+# What a function of C takes as it is; to ask these for a path costs as much as the rest of a call.
+_OF_C = (int, bytes, ffi.CData)
 
 
 def to_c(value: Any) -> Any:
@@ -88,9 +92,11 @@ def to_c(value: Any) -> Any:
         if "\0" in value:
             raise ValueError("a text for the library cannot hold a NUL")
         return value.encode("utf-8", "surrogateescape")
-    if hasattr(value, "__fspath__"):
+    if value is None:
+        return ffi.NULL
+    if not isinstance(value, _OF_C) and hasattr(value, "__fspath__"):
         return to_c(value.__fspath__())
-    return ffi.NULL if value is None else value
+    return value
 
 
 def string(pointer: Any) -> str | None:
@@ -159,7 +165,10 @@ def c_names(family: str, module: dict[str, Any]) -> tuple[Callable[[str], Any], 
     def get(name: str) -> Any:
         if name not in names:
             raise AttributeError(f"no such name: {name}")
-        return CFunction(name) if NAMES[name][1] == "function" else getattr(lib, name)
+        if NAMES[name][1] != "function":
+            return getattr(lib, name)
+        module[name] = CFunction(name)  # asked for once
+        return module[name]
 
     def names_of() -> list[str]:
         return sorted(names | module.keys())

@@ -28,25 +28,36 @@ struct Packet {
     unsigned interface;
 };
 
+// The arguments of recvmsg and sendmsg: one packet, the address of the other side, and the interface.
+struct Message {
+    Message(const void *bytes, size_t size) : part{const_cast<void *>(bytes), size}
+    {
+        header.msg_name = &peer;
+        header.msg_namelen = sizeof peer;
+        header.msg_iov = &part;
+        header.msg_iovlen = 1;
+        header.msg_control = control;
+        header.msg_controllen = sizeof control;
+    }
+    Message(const Message &) = delete;
+    Message &operator=(const Message &) = delete;
+
+    sockaddr_in peer{};
+    iovec part;
+    alignas(cmsghdr) char control[CMSG_SPACE(sizeof(in_pktinfo))] = {};
+    msghdr header{};
+};
+
 bool Receive(int network, Packet &packet)
 {
-    sockaddr_in from{};
-    iovec part = {packet.bytes.data(), packet.bytes.size()};
-    alignas(cmsghdr) char control[CMSG_SPACE(sizeof(in_pktinfo))];
-    msghdr message{};
-    message.msg_name = &from;
-    message.msg_namelen = sizeof from;
-    message.msg_iov = &part;
-    message.msg_iovlen = 1;
-    message.msg_control = control;
-    message.msg_controllen = sizeof control;
-    const ssize_t size = ::recvmsg(network, &message, MSG_DONTWAIT);
-    if (size < 0 || from.sin_family != AF_INET)
+    Message message(packet.bytes.data(), packet.bytes.size());
+    const ssize_t size = ::recvmsg(network, &message.header, MSG_DONTWAIT);
+    if (size < 0 || message.peer.sin_family != AF_INET)
         return false;
     packet.size = static_cast<size_t>(size);
-    packet.from = from.sin_addr;
+    packet.from = message.peer.sin_addr;
     packet.interface = 0;
-    for (cmsghdr *part_of = CMSG_FIRSTHDR(&message); part_of; part_of = CMSG_NXTHDR(&message, part_of)) {
+    for (cmsghdr *part_of = CMSG_FIRSTHDR(&message.header); part_of; part_of = CMSG_NXTHDR(&message.header, part_of)) {
         if (part_of->cmsg_level != IPPROTO_IP || part_of->cmsg_type != IP_PKTINFO)
             continue;
         in_pktinfo info;
@@ -59,20 +70,11 @@ bool Receive(int network, Packet &packet)
 // To the asker's daemon, out of the interface on which the question came and from the address there.
 void Send(int network, std::span<const uint8_t> bytes, in_addr to, unsigned interface, in_addr from)
 {
-    sockaddr_in where{};
-    where.sin_family = AF_INET;
-    where.sin_addr = to;
-    where.sin_port = htons(kPort);
-    iovec part = {const_cast<uint8_t *>(bytes.data()), bytes.size()};
-    alignas(cmsghdr) char control[CMSG_SPACE(sizeof(in_pktinfo))] = {};
-    msghdr message{};
-    message.msg_name = &where;
-    message.msg_namelen = sizeof where;
-    message.msg_iov = &part;
-    message.msg_iovlen = 1;
-    message.msg_control = control;
-    message.msg_controllen = sizeof control;
-    cmsghdr *const head = CMSG_FIRSTHDR(&message);
+    Message message(bytes.data(), bytes.size());
+    message.peer.sin_family = AF_INET;
+    message.peer.sin_addr = to;
+    message.peer.sin_port = htons(kPort);
+    cmsghdr *const head = CMSG_FIRSTHDR(&message.header);
     head->cmsg_level = IPPROTO_IP;
     head->cmsg_type = IP_PKTINFO;
     head->cmsg_len = CMSG_LEN(sizeof(in_pktinfo));
@@ -80,7 +82,7 @@ void Send(int network, std::span<const uint8_t> bytes, in_addr to, unsigned inte
     info.ipi_ifindex = static_cast<int>(interface);
     info.ipi_spec_dst = from;
     std::memcpy(CMSG_DATA(head), &info, sizeof info);
-    ::sendmsg(network, &message, MSG_DONTWAIT | MSG_NOSIGNAL);
+    ::sendmsg(network, &message.header, MSG_DONTWAIT | MSG_NOSIGNAL);
 }
 
 // Reads the present host name; a name that a list cannot hold counts as empty.

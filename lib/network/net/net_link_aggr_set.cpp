@@ -91,7 +91,13 @@ bool Snapshot(tavo::Checkpoint &before, const TAVONETLINKAGGR &aggr)
 int Rebuild(tavo::BondChange &change, tavo::Checkpoint &before)
 {
     before.Begin();
-    tavo::RunNetText(kStop);
+    // An address that is left would compete with that of the bond. A stop that only failed is the script's affair.
+    constexpr int died_of_signal = 128;  // and more, as a shell reports it
+    const int stopped = tavo::RunNetText(kStop);
+    if (stopped == -1 || stopped > died_of_signal) {
+        before.PutBackAll();
+        return ERR_OP_FAILURE;
+    }
     const bool written = change.Apply();
     if (!written)
         before.PutBackFiles();

@@ -5,6 +5,7 @@
 #include "tavo_user.h"
 
 #include "support/scratch_dir.h"
+#include "support/text_lines.h"
 
 #include <array>
 #include <filesystem>
@@ -94,17 +95,6 @@ inline std::array<std::string, 4> AllFiles()
     for (size_t i = 0; i < texts.size(); ++i)
         texts[i] = FileText(kAccountFiles[i]);
     return texts;
-}
-
-inline std::vector<std::string> Lines(const std::string &text)
-{
-    std::vector<std::string> lines;
-    for (size_t at = 0; at < text.size();) {
-        const size_t end = text.find('\n', at);
-        lines.push_back(text.substr(at, end - at));
-        at = end == text.npos ? text.size() : end + 1;
-    }
-    return lines;
 }
 
 // The line of an account; empty when there is none.

@@ -112,6 +112,21 @@ struct Found {
     ~Found() { TLIBSzListFree(list); }
 };
 
+template <class Function, class... Args>
+void OnStore(Trial &run, Function &function, Args... args)
+{
+    const Store store;
+    run(function, store.db, args...);
+}
+
+template <class Function, class... Args>
+void IntoList(Trial &run, Function &function, Args... args)
+{
+    Found found;
+    run(function, &found.list, args...);
+    run.Show(found.list);
+}
+
 }  // namespace
 
 Family AccountFamily()
@@ -133,11 +148,7 @@ Family AccountFamily()
                      run(f, store.db, &time);
                      run.Show(time);
                  }),
-            CALL(TAVOBDbConfSyncTimeSet, 0,
-                 {
-                     const Store store;
-                     run(f, store.db, int64_t{2000});
-                 }),
+            CALL(TAVOBDbConfSyncTimeSet, 0, { OnStore(run, f, int64_t{2000}); }),
             CALL(TAVOBDbCursorGet, 0,
                  {
                      const Store store;
@@ -150,16 +161,8 @@ Family AccountFamily()
                      TAVOBDbFree(key);
                      TAVOBDbFree(value);
                  }),
-            CALL(TAVOBDbCursorSetType, 0,
-                 {
-                     const Store store;
-                     run(f, store.db, int{TAVO_BDB_CURSOR_NEXT});
-                 }),
-            CALL(TAVOBDbDelete, 0,
-                 {
-                     const Store store;
-                     run(f, store.db, "key", 3);
-                 }),
+            CALL(TAVOBDbCursorSetType, 0, { OnStore(run, f, int{TAVO_BDB_CURSOR_NEXT}); }),
+            CALL(TAVOBDbDelete, 0, { OnStore(run, f, "key", 3); }),
             CALL(TAVOBDbDeprecatedGet, 0,
                  {
                      const Store store;
@@ -167,27 +170,15 @@ Family AccountFamily()
                      run(f, store.db, &value);
                      run.Show(value);
                  }),
-            CALL(TAVOBDbDeprecatedSet, 0,
-                 {
-                     const Store store;
-                     run(f, store.db, 1);
-                 }),
-            CALL(TAVOBDbDomainExpireTimeDelete, 0,
-                 {
-                     const Store store;
-                     run(f, store.db);
-                 }),
+            CALL(TAVOBDbDeprecatedSet, 0, { OnStore(run, f, 1); }),
+            CALL(TAVOBDbDomainExpireTimeDelete, 0, { OnStore(run, f); }),
             CALL(TAVOBDbDomainExpireTimeGet, 0,
                  {
                      const Store store;
                      int32_t time = 0;
                      run(f, store.db, &time);
                  }),
-            CALL(TAVOBDbDomainExpireTimeSet, 0,
-                 {
-                     const Store store;
-                     run(f, store.db);
-                 }),
+            CALL(TAVOBDbDomainExpireTimeSet, 0, { OnStore(run, f); }),
             CALL(TAVOBDbFree, 0,
                  {
                      const Store store;
@@ -205,27 +196,15 @@ Family AccountFamily()
                      run.Show(length);
                      TAVOBDbFree(value);
                  }),
-            CALL(TAVOBDbIsNeedToDomainRebuild, kAnswers,
-                 {
-                     const Store store;
-                     run(f, store.db);
-                 }),
-            CALL(TAVOBDbIsNeedToRebuild, kAnswers,
-                 {
-                     const Store store;
-                     run(f, store.db, int64_t{1000});
-                 }),
+            CALL(TAVOBDbIsNeedToDomainRebuild, kAnswers, { OnStore(run, f); }),
+            CALL(TAVOBDbIsNeedToRebuild, kAnswers, { OnStore(run, f, int64_t{1000}); }),
             CALL(TAVOBDbOpen, 0,
                  {
                      TAVOBDB *store = run(f, kStore, O_RDWR, 1);
                      if (store)
                          TAVOBDbClose(store);
                  }),
-            CALL(TAVOBDbSet, 0,
-                 {
-                     const Store store;
-                     run(f, store.db, "another", 7, "value", 5);
-                 }),
+            CALL(TAVOBDbSet, 0, { OnStore(run, f, "another", 7, "value", 5); }),
 
             // Users.
             CALL(BlTLIBIsUserName, kZeroFails | kNoCode, { run(f, "alice"); }),
@@ -259,24 +238,9 @@ Family AccountFamily()
                      const char *const names[] = {"bob"};
                      run(f, names, 1);
                  }),
-            CALL(TAVOUserEnum, 0,
-                 {
-                     Found found;
-                     run(f, &found.list, 1);
-                     run.Show(found.list);
-                 }),
-            CALL(TAVOUserEnumByPrefix, 0,
-                 {
-                     Found found;
-                     run(f, &found.list, 1, "al");
-                     run.Show(found.list);
-                 }),
-            CALL(TAVOUserEnumBySubstr, 0,
-                 {
-                     Found found;
-                     run(f, &found.list, 1, "lic");
-                     run.Show(found.list);
-                 }),
+            CALL(TAVOUserEnum, 0, { IntoList(run, f, 1); }),
+            CALL(TAVOUserEnumByPrefix, 0, { IntoList(run, f, 1, "al"); }),
+            CALL(TAVOUserEnumBySubstr, 0, { IntoList(run, f, 1, "lic"); }),
             CALL(TAVOUserExpiredDateFill, 0,
                  {
                      OneUser one("alice");
@@ -392,24 +356,9 @@ Family AccountFamily()
                      run.Show(text);
                  }),
             CALL(TAVOGroupDescSet, 0, { run(f, "staff", "new hands"); }),
-            CALL(TAVOGroupEnum, 0,
-                 {
-                     Found found;
-                     run(f, &found.list, 1);
-                     run.Show(found.list);
-                 }),
-            CALL(TAVOGroupEnumByPrefix, 0,
-                 {
-                     Found found;
-                     run(f, &found.list, 1, "st");
-                     run.Show(found.list);
-                 }),
-            CALL(TAVOGroupEnumBySubstr, 0,
-                 {
-                     Found found;
-                     run(f, &found.list, 1, "taf");
-                     run.Show(found.list);
-                 }),
+            CALL(TAVOGroupEnum, 0, { IntoList(run, f, 1); }),
+            CALL(TAVOGroupEnumByPrefix, 0, { IntoList(run, f, 1, "st"); }),
+            CALL(TAVOGroupEnumBySubstr, 0, { IntoList(run, f, 1, "taf"); }),
             CALL(TAVOGroupFree, 0,
                  {
                      TAVOGROUP *group = nullptr;

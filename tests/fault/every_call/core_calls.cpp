@@ -43,6 +43,20 @@ struct Pair {
     ~Pair() { TLIBSzHashFree(hash); }
 };
 
+template <class Function, class... Args>
+void OnList(Trial &run, Function &function, Args... args)
+{
+    const Two two;
+    run(function, two.list, args...);
+}
+
+template <class Function, class... Args>
+void OnHash(Trial &run, Function &function, Args... args)
+{
+    const Pair pair;
+    run(function, pair.hash, args...);
+}
+
 struct Core {
     Core()
     {
@@ -117,36 +131,12 @@ Family CoreFamily()
                      run.Show(made);
                      TLIBSzListFree(made);
                  }),
-            CALL(SzTLIBSzListGet, 0,
-                 {
-                     const Two two;
-                     run(f, two.list, 1);
-                 }),
-            CALL(SzTLIBSzListPop, 0,
-                 {
-                     const Two two;
-                     run(f, two.list);
-                 }),
-            CALL(SzTLIBSzListRemove, 0,
-                 {
-                     const Two two;
-                     run(f, two.list, 1);
-                 }),
-            CALL(SzTLIBSzListShift, 0,
-                 {
-                     const Two two;
-                     run(f, two.list);
-                 }),
-            CALL(TLIBISzListClean, 0,
-                 {
-                     const Two two;
-                     run(f, two.list);
-                 }),
-            CALL(TLIBISzListDump, kInChild,
-                 {
-                     const Two two;
-                     run(f, two.list);
-                 }),
+            CALL(SzTLIBSzListGet, 0, { OnList(run, f, 1); }),
+            CALL(SzTLIBSzListPop, 0, { OnList(run, f); }),
+            CALL(SzTLIBSzListRemove, 0, { OnList(run, f, 1); }),
+            CALL(SzTLIBSzListShift, 0, { OnList(run, f); }),
+            CALL(TLIBISzListClean, 0, { OnList(run, f); }),
+            CALL(TLIBISzListDump, kInChild, { OnList(run, f); }),
             CALL(TLIBISzListFind, kNoCode,
                  {
                      const Two two;
@@ -165,11 +155,7 @@ Family CoreFamily()
                      const char *right = "\xC3\x84";
                      run(f, &left, &right);
                  }),
-            CALL(TLIBSzListCaseFind, kNoCode,
-                 {
-                     const Two two;
-                     run(f, two.list, "C");
-                 }),
+            CALL(TLIBSzListCaseFind, kNoCode, { OnList(run, f, "C"); }),
             CALL(TLIBSzListDump2Str, 0,
                  {
                      const Two two;
@@ -177,11 +163,7 @@ Family CoreFamily()
                      run(f, two.list, ",", text, 64);
                      run.Show(text);
                  }),
-            CALL(TLIBSzListFind, kNoCode,
-                 {
-                     const Two two;
-                     run(f, two.list, "c");
-                 }),
+            CALL(TLIBSzListFind, kNoCode, { OnList(run, f, "c"); }),
             CALL(TLIBSzListFree, 0, { run(f, MakeList({"a"}).release()); }),
             CALL(TLIBSzListInsert, 0,
                  {
@@ -195,11 +177,7 @@ Family CoreFamily()
                      run(f, &two.list, kLarge.c_str());
                      run.Show(two.list);
                  }),
-            CALL(TLIBSzListRemoveAll, 0,
-                 {
-                     const Two two;
-                     run(f, two.list);
-                 }),
+            CALL(TLIBSzListRemoveAll, 0, { OnList(run, f); }),
             CALL(TLIBSzListSet, 0,
                  {
                      Two two;
@@ -212,11 +190,7 @@ Family CoreFamily()
                      run(f, two.list, int{TLIB_SZLIST_SORTED});
                      run.Show(two.list);
                  }),
-            CALL(TLIBSzListSorted, 0,
-                 {
-                     const Two two;
-                     run(f, two.list);
-                 }),
+            CALL(TLIBSzListSorted, 0, { OnList(run, f); }),
             CALL(TLIBSzListUnshift, 0,
                  {
                      Two two;
@@ -256,21 +230,9 @@ Family CoreFamily()
                      run.Show(pair.hash);
                  }),
             CALL(PshTLIBSzHashAlloc, 0, { TLIBSzHashFree(run(f, 64)); }),
-            CALL(PslSzHashRemoveAll, 0,
-                 {
-                     const Pair pair;
-                     run(f, pair.hash);
-                 }),
-            CALL(SzTLIBSzHashGetValue, 0,
-                 {
-                     const Pair pair;
-                     run(f, pair.hash, "key");
-                 }),
-            CALL(SzTLIBSzHashRemoveKey, 0,
-                 {
-                     const Pair pair;
-                     run(f, pair.hash, "key");
-                 }),
+            CALL(PslSzHashRemoveAll, 0, { OnHash(run, f); }),
+            CALL(SzTLIBSzHashGetValue, 0, { OnHash(run, f, "key"); }),
+            CALL(SzTLIBSzHashRemoveKey, 0, { OnHash(run, f, "key"); }),
             CALL(TLIBICopyHash, 0,
                  {
                      const Pair from;
@@ -279,16 +241,8 @@ Family CoreFamily()
                      run.Show(to);
                      TLIBSzHashFree(to);
                  }),
-            CALL(TLIBIGetLookDict, 0,
-                 {
-                     const Pair pair;
-                     run(f, pair.hash, "key");
-                 }),
-            CALL(TLIBIHashDump, kInChild,
-                 {
-                     const Pair pair;
-                     run(f, pair.hash);
-                 }),
+            CALL(TLIBIGetLookDict, 0, { OnHash(run, f, "key"); }),
+            CALL(TLIBIHashDump, kInChild, { OnHash(run, f); }),
             CALL(TLIBIInsertPair, 0,
                  {
                      const Pair pair;
@@ -296,11 +250,7 @@ Family CoreFamily()
                      run.Show(pair.hash);
                  }),
             CALL(TLIBIRadixHashCode, 0, { run(f, "key", 16); }),
-            CALL(TLIBISetLookDict, 0,
-                 {
-                     const Pair pair;
-                     run(f, pair.hash, "key");
-                 }),
+            CALL(TLIBISetLookDict, 0, { OnHash(run, f, "key"); }),
             CALL(TLIBSzHashEnumKey, 0,
                  {
                      const Pair pair;
@@ -309,16 +259,8 @@ Family CoreFamily()
                      run.Show(two.list);
                  }),
             CALL(TLIBSzHashFree, 0, { run(f, PshTLIBSzHashAlloc(64)); }),
-            CALL(TLIBSzHashGetLength, 0,
-                 {
-                     const Pair pair;
-                     run(f, pair.hash);
-                 }),
-            CALL(TLIBSzHashPairNum, 0,
-                 {
-                     const Pair pair;
-                     run(f, pair.hash);
-                 }),
+            CALL(TLIBSzHashGetLength, 0, { OnHash(run, f); }),
+            CALL(TLIBSzHashPairNum, 0, { OnHash(run, f); }),
             CALL(TLIBSzHashSetValue, kNoCode,
                  {
                      Pair pair;
@@ -540,11 +482,7 @@ Family CoreFamily()
                      run.Show(two.list);
                  }),
             CALL(TAVOSchedulerHup, 0, { run(f, SIGHUP); }),
-            CALL(TAVOUserModifySmbConf, 0,
-                 {
-                     Pair pair;
-                     run(f, pair.hash);
-                 }),
+            CALL(TAVOUserModifySmbConf, 0, { OnHash(run, f); }),
             CALL(TLIBScemdNotify, 0, { run(f, SIGHUP); }),
         },
         [] { return std::make_shared<Core>(); },

@@ -186,6 +186,17 @@ TEST_F(Bond, ANetworkThatDoesNotStartIsPutBack)
     EXPECT_EQ(Files(), kPlainFiles);
 }
 
+// The start script dies while it stops the network.
+TEST_F(Bond, ANetworkThatIsNotStoppedIsPutBack)
+{
+    WriteFile("/var/standin/rc.network.hook",
+              "#!/bin/sh\n[ $1 = start ] || [ -e /tmp/once ] || { touch /tmp/once; kill -9 $PPID; }\n", 0755);
+    EXPECT_EQ(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}), -1);
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_link_aggr_set"}));
+    EXPECT_EQ(NetworkCalls(), std::string("rc.network stop\n") + kStopStart);
+    EXPECT_EQ(Files(), kPlainFiles);
+}
+
 // Each interface is on its own, or belongs to a bond that has a file; no file is incomplete.
 void ExpectStartable(const std::string &when)
 {

@@ -9,6 +9,7 @@
 #include "support/eventually.h"
 #include "support/rounds.h"
 #include "support/scratch_dir.h"
+#include "support/text_lines.h"
 #include "support/virtual_cable.h"
 
 #include <gmock/gmock.h>
@@ -35,6 +36,7 @@
 #include <unistd.h>
 
 using test::Eventually;
+using test::Lines;
 using test::Node;
 using test::ReadFile;
 using test::ShellStatus;
@@ -52,17 +54,6 @@ constexpr const char *kDaemon = "/usr/tavo/bin/findhostd";
 constexpr const char *kPidFile = "/var/run/findhostd.pid";
 
 size_t awaited_lines = 0;  // the library sleeps until the list has so many, 20 seconds at most
-
-std::vector<std::string> Lines(const std::string &text)
-{
-    std::vector<std::string> lines;
-    for (size_t at = 0; at < text.size();) {
-        const size_t end = text.find('\n', at);
-        lines.push_back(text.substr(at, end - at));
-        at = end + 1;
-    }
-    return lines;
-}
 
 std::string ListText()
 {

@@ -1,7 +1,8 @@
-// What all verbs of tavoctl share: exit statuses, refusals, tables and JSON, failures, questions, completion.
+// The common parts of all verbs of tavoctl: exit statuses, refusals, tables and JSON, failures, questions, completion.
 #include "run_tavoctl.h"
 
 #include "support/scratch_dir.h"
+#include "support/text_lines.h"
 
 #include "tavo_error.h"
 
@@ -15,6 +16,8 @@
 namespace {
 
 using nlohmann::json;
+using test::Lines;
+using test::Ran;
 using test::ReadFile;
 using test::ScratchDir;
 using test::Tavoctl;
@@ -26,15 +29,6 @@ using testing::AnyOf;
 using testing::HasSubstr;
 using testing::Not;
 using testing::StartsWith;
-
-std::vector<std::string> Lines(const std::string &text)
-{
-    std::vector<std::string> lines;
-    std::istringstream in(text);
-    for (std::string line; std::getline(in, line);)
-        lines.push_back(line);
-    return lines;
-}
 
 // tavoctl is a program of its own: where only the entering program can start one, there is nothing to test.
 class NeedsPrograms : public testing::Environment {
@@ -339,6 +333,17 @@ TEST(TavoctlFrame, ColoursAndThePagerAreForTerminals)
         EXPECT_EQ(out.find("\x1b[") != out.npos, coloured) << variable << value << rows << out;
         EXPECT_EQ(out.starts_with("paged "), paged) << variable << value << rows << out;
         EXPECT_THAT(Tavoctl(list).out, Not(AnyOf(HasSubstr("\x1b"), HasSubstr("paged"))));
+    }
+    // A pager that ends before it has read everything costs neither the rest of the answer nor the exit status.
+    std::string large = "a=degraded\n";
+    for (int i = 0; i < 9000; ++i)
+        large += "key" + std::to_string(i) + "=some value\n";
+    WriteFile(dir / "f", large);
+    for (const char *pager : {"/no/such/program 2>/dev/null", "head -n 2"}) {
+        ::setenv("PAGER", pager, 1);
+        const Ran ran = TavoctlAtTerminal(list, {}, 3);
+        EXPECT_THAT(ran.out, HasSubstr("degraded")) << pager;
+        EXPECT_EQ(ran.status, 0) << pager;
     }
 }
 

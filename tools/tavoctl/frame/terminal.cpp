@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <clocale>
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -69,9 +70,12 @@ void Terminal::Page(const std::string &text)
         std::cout << text;
         return;
     }
-    // A user who has read enough closes the pager.
+    // A user who has read enough closes the pager, which must not end this program. Set only now: the pager starts with the
+    // signal's default.
+    const auto before = ::signal(SIGPIPE, SIG_IGN);
     (void)!std::fwrite(text.data(), 1, text.size(), pipe);
     const int status = ::pclose(pipe);
+    ::signal(SIGPIPE, before);
     constexpr int no_such_program = 127;
     if (WIFEXITED(status) && WEXITSTATUS(status) == no_such_program)
         std::cout << text;
