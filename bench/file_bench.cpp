@@ -4,9 +4,6 @@
 
 #include "compare.h"
 
-#include <glib.h>
-#include <ini.h>
-
 #include <cstdio>
 #include <cstring>
 #include <filesystem>
@@ -15,6 +12,8 @@
 #include <vector>
 
 #include <fcntl.h>
+#include <glib.h>
+#include <ini.h>
 #include <spawn.h>
 #include <sys/wait.h>
 #include <unistd.h>

@@ -4,7 +4,6 @@
 #include "compare.h"
 
 #include <absl/container/flat_hash_map.h>
-#include <glib.h>
 
 #include <algorithm>
 #include <cstring>
@@ -14,6 +13,8 @@
 #include <string_view>
 #include <unordered_map>
 #include <vector>
+
+#include <glib.h>
 
 namespace {
 

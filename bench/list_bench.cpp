@@ -4,7 +4,6 @@
 
 #include "compare.h"
 
-#include <glib.h>
 #include <unicode/uchar.h>
 #include <unicode/ustring.h>
 
@@ -13,6 +12,8 @@
 #include <random>
 #include <string>
 #include <vector>
+
+#include <glib.h>
 
 namespace {
 

@@ -1,12 +1,12 @@
 // What a call costs from Python: through the module, under its C name, and by hand through ctypes, against the call from C.
 // Changes the accounts of the root that it runs in.
-#include <Python.h>
-
 #include "tavo_file.h"
 #include "tavo_str.h"
 #include "tavo_user.h"
 
 #include "compare.h"
+
+#include <Python.h>
 
 #include <cstdio>
 #include <cstdlib>

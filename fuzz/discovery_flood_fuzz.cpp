@@ -1,7 +1,6 @@
 // A flood of queries and replies at any moments and from any addresses: how many are answered, and who is listed.
 #include "answer_budget.h"
 #include "host_table.h"
-
 #include "input.h"
 
 #include <algorithm>

@@ -1,10 +1,8 @@
 // Discovery packets: what is taken for a reply comes back from a packet of our own, and from the line of a list.
 #include "host_table.h"
-#include "packet.h"
-
-#include "network/detail/host_list.h"
-
 #include "input.h"
+#include "network/detail/host_list.h"
+#include "packet.h"
 
 #include <cstring>
 

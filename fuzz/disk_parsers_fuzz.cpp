@@ -1,5 +1,8 @@
 // What the kernel's files, the drives and the partitioning tool say: parsers read no further than the text, keep to what it
 // plainly says, and take their own output back.
+#include "tavo_partition.h"
+
+#include "input.h"
 #include "storage/detail/ata_pass_through.h"
 #include "storage/detail/boot_sector.h"
 #include "storage/detail/caching_page.h"
@@ -9,10 +12,6 @@
 #include "storage/detail/proc_partitions.h"
 #include "storage/detail/sfdisk_line.h"
 #include "storage/detail/usb_id.h"
-
-#include "tavo_partition.h"
-
-#include "input.h"
 
 #include <algorithm>
 #include <cstdint>

@@ -1,7 +1,8 @@
 // Line formats: what is accepted is what printf would make of two texts, and nothing else than "%s" and "%%" gets there.
+#include "tavo_section.h"
+
 #include "core/detail/line_format.h"
 #include "input.h"
-#include "tavo_section.h"
 
 #include <cstdint>
 #include <cstdio>

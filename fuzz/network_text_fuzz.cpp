@@ -1,14 +1,13 @@
 // Addresses, masks and names against the C library and plain models, and what the kernel's tables are read as.
 #include "tavo_net.h"
 
+#include "input.h"
 #include "network/detail/hosts_file.h"
 #include "network/detail/interface_name.h"
 #include "network/detail/ipv6_route_table.h"
 #include "network/detail/ipv6_text.h"
 #include "network/detail/route_table.h"
 #include "network/detail/socket_table.h"
-
-#include "input.h"
 
 #include <cstring>
 #include <optional>

@@ -1,11 +1,12 @@
 // Files with sections: what is set is read back, what is removed is gone, and comments and other sections stay. The input
 // is a section name, a key, a value and the text of a file, each ended by a 0xFE byte.
+#include "tavo_section.h"
+
 #include "core/detail/key_value_line.h"
 #include "core/detail/line_reader.h"
 #include "core/detail/list_owner.h"
 #include "core/detail/section_header.h"
 #include "input.h"
-#include "tavo_section.h"
 
 #include <cstdint>
 #include <cstdio>

@@ -1,13 +1,14 @@
 // Settings files: every line means to us what the plain token rule makes of it, and what is set is read back while all
 // other lines stay as they are. The input is a key, a value and the text of a file, each ended by a 0xFE byte.
+#include "tavo_file.h"
+#include "tavo_str.h"
+
 #include "core/detail/key_value_line.h"
 #include "core/detail/line_format.h"
 #include "core/detail/line_reader.h"
 #include "core/detail/owner.h"
 #include "core/detail/settings_text.h"
 #include "input.h"
-#include "tavo_file.h"
-#include "tavo_str.h"
 
 #include <cstdint>
 #include <vector>

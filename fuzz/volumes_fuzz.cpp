@@ -1,7 +1,6 @@
 // The kernel's texts about mounts and processes: only a mount at /volumeN is a volume, and a process has the name of
 // its program.
 #include "input.h"
-
 #include "service/detail/process_named.h"
 #include "service/detail/volume_list.h"
 

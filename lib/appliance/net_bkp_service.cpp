@@ -1,6 +1,5 @@
 // Stops, starts, restarts or reloads the network-backup server.
 #include "tavo_appliance.h"
-
 #include "tavo_proc.h"
 
 #include "appliance/detail/daemon_signal.h"

@@ -1,5 +1,6 @@
 // Renames and removes users and groups in Samba's settings file.
 #include "tavo_appliance.h"
+#include "tavo_str.h"
 
 #include "core/detail/appliance_paths.h"
 #include "core/detail/extras.h"
@@ -7,7 +8,6 @@
 #include "core/detail/guard.h"
 #include "core/detail/keep_fault.h"
 #include "core/detail/smb_user_lists.h"
-#include "tavo_str.h"
 
 namespace {
 

@@ -1,7 +1,6 @@
 // Sets the enable key of a service to "no" without stopping it.
-#include "tavo_service.h"
-
 #include "tavo_file.h"
+#include "tavo_service.h"
 
 #include "core/detail/fault.h"
 #include "core/detail/log.h"

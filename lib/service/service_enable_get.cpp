@@ -1,7 +1,6 @@
 // Checks whether the service that owns a data folder is enabled.
-#include "tavo_service.h"
-
 #include "tavo_file.h"
+#include "tavo_service.h"
 
 #include "core/detail/fault.h"
 #include "core/detail/keep_fault.h"

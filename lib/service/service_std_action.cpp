@@ -1,8 +1,7 @@
 // Switches a service by its key, its data folders, its daemons or its script: the standard handler.
-#include "tavo_service.h"
-
 #include "tavo_file.h"
 #include "tavo_proc.h"
+#include "tavo_service.h"
 
 #include "core/detail/fault.h"
 #include "core/detail/log.h"

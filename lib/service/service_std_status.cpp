@@ -1,8 +1,7 @@
 // Checks whether a service is enabled, has its data folders and runs: the standard handler.
-#include "tavo_service.h"
-
 #include "tavo_lock.h"
 #include "tavo_proc.h"
+#include "tavo_service.h"
 
 #include "core/detail/guard.h"
 #include "core/detail/process_list.h"

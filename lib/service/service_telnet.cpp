@@ -1,8 +1,7 @@
 // Switches Telnet. inetd serves other protocols as well, so it is restarted, never stopped: it reads the key again.
-#include "tavo_service.h"
-
 #include "tavo_file.h"
 #include "tavo_proc.h"
+#include "tavo_service.h"
 
 #include "core/detail/fault.h"
 #include "core/detail/log.h"

@@ -1,7 +1,6 @@
 // Runs the start-up scripts of installed packages.
-#include "tavo_service.h"
-
 #include "tavo_proc.h"
+#include "tavo_service.h"
 
 #include "core/detail/folder_reader.h"
 #include "core/detail/guard.h"

@@ -1,6 +1,5 @@
 // Switches user homes: the "homes" share and, when it is enabled, a folder for every user.
 #include "tavo_service.h"
-
 #include "tavo_user.h"
 
 #include "core/detail/guard.h"

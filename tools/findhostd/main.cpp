@@ -1,11 +1,11 @@
 // findhostd: answers the discovery queries of other appliances and lists who answers ours.
 //
 // Two processes: one listens to the network and has no rights, one writes the list and never hears the network.
+#include "tavo_file.h"
+
 #include "network_part.h"
 #include "root_part.h"
 #include "standard_descriptors.h"
-
-#include "tavo_file.h"
 
 #include <cerrno>
 #include <charconv>

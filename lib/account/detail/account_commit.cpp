@@ -1,10 +1,11 @@
 // Replaces everything that one change touches together.
 #include "account/detail/account_commit.h"
 
+#include "tavo_error.h"
+
 #include "account/detail/commit_files.h"
 #include "account/detail/store_content.h"
 #include "core/detail/open_file.h"
-#include "tavo_error.h"
 
 #include <algorithm>
 

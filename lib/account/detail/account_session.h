@@ -3,11 +3,12 @@
 #ifndef TAVO_ACCOUNT_DETAIL_ACCOUNT_SESSION_H
 #define TAVO_ACCOUNT_DETAIL_ACCOUNT_SESSION_H
 
+#include "tavo_lock.h"
+
 #include "account/detail/btree.h"
 #include "account/detail/store_build.h"
 #include "account/detail/system_lock.h"
 #include "account/detail/text_stores.h"
-#include "tavo_lock.h"
 
 #include <memory>
 #include <span>

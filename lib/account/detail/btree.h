@@ -3,9 +3,10 @@
 #ifndef TAVO_ACCOUNT_DETAIL_BTREE_H
 #define TAVO_ACCOUNT_DETAIL_BTREE_H
 
+#include "tavo_bdb.h"
+
 #include "account/detail/account_name.h"
 #include "account/detail/store_view.h"
-#include "tavo_bdb.h"
 
 #include <map>
 #include <memory>

@@ -8,11 +8,10 @@
 
 #include <cerrno>
 
+#include <db_185.h>
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
-
-#include <db_185.h>
 
 namespace tavo {
 namespace {

@@ -1,10 +1,11 @@
 // Reads and writes the commit marker of the accounts.
 #include "account/detail/commit_marker.h"
 
+#include "tavo_error.h"
+
 #include "account/detail/store_content.h"
 #include "core/detail/open_file.h"
 #include "core/detail/text_fields.h"
-#include "tavo_error.h"
 
 #include <algorithm>
 #include <charconv>

@@ -1,8 +1,9 @@
 // Completes the commits of programs that died over them.
 #include "account/detail/commit_resume.h"
 
-#include "account/detail/commit_files.h"
 #include "tavo_error.h"
+
+#include "account/detail/commit_files.h"
 
 #include <algorithm>
 #include <cerrno>

@@ -1,8 +1,9 @@
 // Writes the text files of an account family by what its open stores say.
 #include "account/detail/family_dump.h"
 
-#include "account/detail/btree.h"
 #include "tavo_error.h"
+
+#include "account/detail/btree.h"
 
 #include <sys/stat.h>
 

@@ -2,9 +2,10 @@
 #ifndef TAVO_ACCOUNT_DETAIL_GROUP_ACCOUNTS_H
 #define TAVO_ACCOUNT_DETAIL_GROUP_ACCOUNTS_H
 
+#include "tavo_group.h"
+
 #include "account/detail/group_line.h"
 #include "account/detail/id_index.h"
-#include "tavo_group.h"
 
 namespace tavo {
 

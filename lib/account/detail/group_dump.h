@@ -2,10 +2,11 @@
 #ifndef TAVO_ACCOUNT_DETAIL_GROUP_DUMP_H
 #define TAVO_ACCOUNT_DETAIL_GROUP_DUMP_H
 
+#include "tavo_group.h"
+
 #include "account/detail/account_commit.h"
 #include "account/detail/indexed_accounts.h"
 #include "core/detail/where.h"
-#include "tavo_group.h"
 
 #include <string>
 

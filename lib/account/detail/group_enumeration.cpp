@@ -1,11 +1,12 @@
 // Which groups an enumeration lists.
 #include "account/detail/group_enumeration.h"
 
+#include "tavo_group.h"
+
 #include "account/detail/account_name.h"
 #include "account/detail/account_session.h"
 #include "account/detail/group_line.h"
 #include "account/detail/group_texts.h"
-#include "tavo_group.h"
 
 #include <array>
 

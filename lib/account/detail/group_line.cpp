@@ -1,8 +1,9 @@
 // Reads and writes lines of the group files.
 #include "account/detail/group_line.h"
 
-#include "account/detail/colon_fields.h"
 #include "tavo_error.h"
+
+#include "account/detail/colon_fields.h"
 
 namespace tavo {
 

@@ -1,9 +1,10 @@
 // Renames and deletions of users in the member lists of all groups.
 #include "account/detail/group_members.h"
 
+#include "tavo_error.h"
+
 #include "account/detail/group_line.h"
 #include "account/detail/store_family.h"
-#include "tavo_error.h"
 
 #include <utility>
 #include <vector>

@@ -1,14 +1,15 @@
 // Turns the two text files of the group family into the content of its three stores.
 #include "account/detail/group_texts.h"
 
+#include "tavo_group.h"
+#include "tavo_lock.h"
+
 #include "account/detail/account_name.h"
 #include "account/detail/btree.h"
 #include "account/detail/group_line.h"
 #include "account/detail/id_index.h"
 #include "account/detail/misc_line.h"
 #include "core/detail/text_fields.h"
-#include "tavo_group.h"
-#include "tavo_lock.h"
 
 #include <algorithm>
 

@@ -1,11 +1,12 @@
 // The daemons that answer the system's look-ups of users and groups from memory.
 #include "account/detail/name_caches.h"
 
+#include "tavo_proc.h"
+
 #include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
 #include "core/detail/owner.h"
 #include "core/detail/run_command.h"
-#include "tavo_proc.h"
 
 #include <new>
 

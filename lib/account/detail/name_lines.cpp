@@ -1,9 +1,10 @@
 // Changes the lines of users in a file of another program.
 #include "account/detail/name_lines.h"
 
+#include "tavo_str.h"
+
 #include "core/detail/keep_fault.h"
 #include "core/detail/line_reader.h"
-#include "tavo_str.h"
 
 namespace tavo {
 

@@ -1,13 +1,14 @@
 // What a change of users or groups means for the files of other programs.
 #include "account/detail/neighbour_changes.h"
 
+#include "tavo_lock.h"
+
 #include "account/detail/follow_up_log.h"
 #include "account/detail/group_accounts.h"
 #include "account/detail/group_dump.h"
 #include "account/detail/group_members.h"
 #include "account/detail/group_texts.h"
 #include "core/detail/keep_fault.h"
-#include "tavo_lock.h"
 
 #include <algorithm>
 #include <iterator>

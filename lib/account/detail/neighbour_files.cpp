@@ -1,11 +1,12 @@
 // The files of other programs in which users and groups stand by name.
 #include "account/detail/neighbour_files.h"
 
+#include "tavo_error.h"
+
 #include "account/detail/ftp_chroot_list.h"
 #include "account/detail/share_groups.h"
 #include "core/detail/appliance_paths.h"
 #include "core/detail/smb_user_lists.h"
-#include "tavo_error.h"
 
 namespace tavo {
 namespace {

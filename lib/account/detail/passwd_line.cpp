@@ -1,8 +1,9 @@
 // Reads and writes lines of /etc/passwd.
 #include "account/detail/passwd_line.h"
 
-#include "account/detail/colon_fields.h"
 #include "tavo_error.h"
+
+#include "account/detail/colon_fields.h"
 
 namespace tavo {
 

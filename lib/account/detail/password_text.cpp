@@ -1,8 +1,9 @@
 // Passwords in the encodings that the Samba hashes are made of.
 #include "account/detail/password_text.h"
 
-#include "core/detail/extras.h"
 #include "tavo_error.h"
+
+#include "core/detail/extras.h"
 
 #include <new>
 

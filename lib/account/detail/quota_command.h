@@ -2,10 +2,11 @@
 #ifndef TAVO_ACCOUNT_DETAIL_QUOTA_COMMAND_H
 #define TAVO_ACCOUNT_DETAIL_QUOTA_COMMAND_H
 
+#include "tavo_error.h"
+
 #include "account/detail/quota_volumes.h"
 #include "core/detail/run_command.h"
 #include "core/detail/shell_command.h"
-#include "tavo_error.h"
 
 namespace tavo {
 

@@ -1,10 +1,11 @@
 // The lock that Samba's own programs take on its password file.
 #include "account/detail/samba_lock.h"
 
+#include "tavo_error.h"
+
 #include "account/detail/samba_latecomers.h"
 #include "account/detail/store_family.h"
 #include "core/detail/open_file.h"
-#include "tavo_error.h"
 
 #include <ctime>
 #include <new>

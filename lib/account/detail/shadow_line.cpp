@@ -1,8 +1,9 @@
 // Reads and writes lines of /etc/shadow.
 #include "account/detail/shadow_line.h"
 
-#include "account/detail/colon_fields.h"
 #include "tavo_error.h"
+
+#include "account/detail/colon_fields.h"
 
 #include <algorithm>
 

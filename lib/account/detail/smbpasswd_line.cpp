@@ -1,8 +1,9 @@
 // Reads and writes lines of Samba's password file.
 #include "account/detail/smbpasswd_line.h"
 
-#include "account/detail/colon_fields.h"
 #include "tavo_error.h"
+
+#include "account/detail/colon_fields.h"
 
 #include <algorithm>
 #include <cstdio>

@@ -1,13 +1,14 @@
 // Rebuilds the stores of a family from its text files.
 #include "account/detail/store_build.h"
 
+#include "tavo_error.h"
+
 #include "account/detail/btree.h"
 #include "account/detail/commit_resume.h"
 #include "account/detail/domain_part.h"
 #include "account/detail/free_name.h"
 #include "account/detail/store_seal.h"
 #include "core/detail/owner.h"
-#include "tavo_error.h"
 
 #include <cstring>
 #include <filesystem>

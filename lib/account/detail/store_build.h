@@ -2,10 +2,11 @@
 #ifndef TAVO_ACCOUNT_DETAIL_STORE_BUILD_H
 #define TAVO_ACCOUNT_DETAIL_STORE_BUILD_H
 
+#include "tavo_error.h"
+
 #include "account/detail/account_name.h"
 #include "account/detail/store_content.h"
 #include "account/detail/store_family.h"
-#include "tavo_error.h"
 
 namespace tavo {
 

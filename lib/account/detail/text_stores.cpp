@@ -1,9 +1,10 @@
 // The stores of a family as the text files give them.
 #include "account/detail/text_stores.h"
 
+#include "tavo_error.h"
+
 #include "account/detail/account_name.h"
 #include "core/detail/text_fields.h"
-#include "tavo_error.h"
 
 #include <algorithm>
 #include <cerrno>

@@ -2,10 +2,11 @@
 #ifndef TAVO_ACCOUNT_DETAIL_USER_ACCOUNTS_H
 #define TAVO_ACCOUNT_DETAIL_USER_ACCOUNTS_H
 
+#include "tavo_user.h"
+
 #include "account/detail/passwd_line.h"
 #include "account/detail/password_hash.h"
 #include "account/detail/store_view.h"
-#include "tavo_user.h"
 
 #include <ctime>
 #include <string>

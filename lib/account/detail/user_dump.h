@@ -2,9 +2,10 @@
 #ifndef TAVO_ACCOUNT_DETAIL_USER_DUMP_H
 #define TAVO_ACCOUNT_DETAIL_USER_DUMP_H
 
+#include "tavo_user.h"
+
 #include "account/detail/account_commit.h"
 #include "account/detail/indexed_accounts.h"
-#include "tavo_user.h"
 
 #include <string>
 #include <vector>

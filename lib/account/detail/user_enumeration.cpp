@@ -1,14 +1,15 @@
 // Which accounts an enumeration lists.
 #include "account/detail/user_enumeration.h"
 
+#include "tavo_appliance.h"
+#include "tavo_user.h"
+
 #include "account/detail/account_name.h"
 #include "account/detail/account_session.h"
 #include "account/detail/passwd_line.h"
 #include "account/detail/user_texts.h"
 #include "core/detail/list_owner.h"
 #include "core/detail/setting_switch.h"
-#include "tavo_appliance.h"
-#include "tavo_user.h"
 
 #include <array>
 

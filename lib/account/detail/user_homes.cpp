@@ -1,6 +1,8 @@
 // The home folders of users that are added, renamed and deleted.
 #include "account/detail/user_homes.h"
 
+#include "tavo_section.h"
+
 #include "account/detail/account_name.h"
 #include "core/detail/appliance_paths.h"
 #include "core/detail/keep_fault.h"
@@ -9,7 +11,6 @@
 #include "core/detail/run_command.h"
 #include "core/detail/setting_switch.h"
 #include "core/detail/shell_command.h"
-#include "tavo_section.h"
 
 #include <charconv>
 #include <filesystem>

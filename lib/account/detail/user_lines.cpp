@@ -1,13 +1,14 @@
 // Changes of the shadow and the Samba line of one user, beside those of whole accounts.
 #include "account/detail/user_lines.h"
 
+#include "tavo_appliance.h"
+#include "tavo_lock.h"
+
 #include "account/detail/account_name.h"
 #include "account/detail/account_transaction.h"
 #include "account/detail/user_dump.h"
 #include "account/detail/user_texts.h"
 #include "core/detail/log.h"
-#include "tavo_appliance.h"
-#include "tavo_lock.h"
 
 namespace tavo {
 namespace {

@@ -1,6 +1,9 @@
 // Turns the four text files of the user family into the content of its five stores.
 #include "account/detail/user_texts.h"
 
+#include "tavo_lock.h"
+#include "tavo_user.h"
+
 #include "account/detail/account_name.h"
 #include "account/detail/btree.h"
 #include "account/detail/colon_fields.h"
@@ -9,8 +12,6 @@
 #include "account/detail/passwd_line.h"
 #include "account/detail/shadow_line.h"
 #include "core/detail/text_fields.h"
-#include "tavo_lock.h"
-#include "tavo_user.h"
 
 #include <algorithm>
 

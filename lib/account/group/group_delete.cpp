@@ -1,5 +1,6 @@
 // Deletes groups.
 #include "tavo_group.h"
+#include "tavo_lock.h"
 
 #include "account/detail/account_name.h"
 #include "account/detail/account_transaction.h"
@@ -8,7 +9,6 @@
 #include "account/detail/group_texts.h"
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
-#include "tavo_lock.h"
 
 #include <map>
 

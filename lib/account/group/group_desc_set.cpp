@@ -1,5 +1,6 @@
 // Sets or deletes the description of a group.
 #include "tavo_group.h"
+#include "tavo_lock.h"
 
 #include "account/detail/account_name.h"
 #include "account/detail/account_transaction.h"
@@ -7,7 +8,6 @@
 #include "account/detail/group_dump.h"
 #include "account/detail/group_texts.h"
 #include "core/detail/guard.h"
-#include "tavo_lock.h"
 
 extern "C" int TAVOGroupDescSet(const char *szName, const char *szDesc)
 {

@@ -1,12 +1,12 @@
 // Lists the members of a group.
 #include "tavo_group.h"
+#include "tavo_user.h"
 
 #include "account/detail/account_name.h"
 #include "account/detail/group_line.h"
 #include "account/detail/group_owner.h"
 #include "account/detail/user_enumeration.h"
 #include "core/detail/guard.h"
-#include "tavo_user.h"
 
 #include <optional>
 

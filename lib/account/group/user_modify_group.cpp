@@ -1,5 +1,6 @@
 // Applies renames and deletions of users to the member lists of all groups.
 #include "tavo_group.h"
+#include "tavo_lock.h"
 
 #include "account/detail/account_name.h"
 #include "account/detail/account_transaction.h"
@@ -7,7 +8,6 @@
 #include "account/detail/group_members.h"
 #include "account/detail/group_texts.h"
 #include "core/detail/guard.h"
-#include "tavo_lock.h"
 
 extern "C" int TAVOUserModifyGroup(const TLIBSZHASH *pshNames)
 {

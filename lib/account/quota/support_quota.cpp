@@ -1,9 +1,9 @@
 // Checks whether the model has quotas.
+#include "tavo_file.h"
 #include "tavo_quota.h"
 
 #include "core/detail/keep_fault.h"
 #include "core/detail/setting_switch.h"
-#include "tavo_file.h"
 
 #include <strings.h>
 

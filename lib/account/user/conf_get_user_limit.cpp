@@ -1,9 +1,9 @@
 // Computes how many more accounts may be created.
+#include "tavo_file.h"
 #include "tavo_user.h"
 
 #include "core/detail/fault.h"
 #include "core/detail/setting_switch.h"
-#include "tavo_file.h"
 
 #include <charconv>
 #include <cstring>

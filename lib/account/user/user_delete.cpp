@@ -1,4 +1,6 @@
 // Deletes users.
+#include "tavo_appliance.h"
+#include "tavo_quota.h"
 #include "tavo_user.h"
 
 #include "account/detail/account_name.h"
@@ -11,8 +13,6 @@
 #include "core/detail/list_owner.h"
 #include "core/detail/log.h"
 #include "core/detail/setting_switch.h"
-#include "tavo_appliance.h"
-#include "tavo_quota.h"
 
 #include <set>
 

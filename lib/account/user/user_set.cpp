@@ -1,4 +1,5 @@
 // Adds, changes and renames users.
+#include "tavo_appliance.h"
 #include "tavo_user.h"
 
 #include "account/detail/account_transaction.h"
@@ -8,7 +9,6 @@
 #include "core/detail/keep_fault.h"
 #include "core/detail/log.h"
 #include "core/detail/setting_switch.h"
-#include "tavo_appliance.h"
 
 #include <strings.h>
 

@@ -1,4 +1,6 @@
 // Stores password hashes that were computed elsewhere.
+#include "tavo_appliance.h"
+#include "tavo_lock.h"
 #include "tavo_user.h"
 
 #include "account/detail/account_name.h"
@@ -11,8 +13,6 @@
 #include "account/detail/user_texts.h"
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
-#include "tavo_appliance.h"
-#include "tavo_lock.h"
 
 namespace {
 

@@ -1,8 +1,9 @@
 // Signals to daemons of the appliance that may or may not run.
 #include "appliance/detail/daemon_signal.h"
 
-#include "core/detail/keep_fault.h"
 #include "tavo_proc.h"
+
+#include "core/detail/keep_fault.h"
 
 namespace tavo {
 

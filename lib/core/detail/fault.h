@@ -2,8 +2,9 @@
 #ifndef TAVO_CORE_DETAIL_FAULT_H
 #define TAVO_CORE_DETAIL_FAULT_H
 
-#include "core/detail/where.h"
 #include "tavo_error.h"
+
+#include "core/detail/where.h"
 
 namespace tavo {
 

@@ -1,9 +1,10 @@
 // Replaces a whole file.
 #include "core/detail/file_rewrite.h"
 
+#include "tavo_error.h"
+
 #include "core/detail/file_target.h"
 #include "core/detail/line_reader.h"
-#include "tavo_error.h"
 
 #include <algorithm>
 #include <new>

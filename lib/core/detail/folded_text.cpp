@@ -3,10 +3,10 @@
 
 #include "core/detail/extras.h"
 
+#include <unicode/utf8.h>
+
 #include <climits>
 #include <cstring>
-
-#include <unicode/utf8.h>
 
 namespace tavo {
 namespace {

@@ -1,7 +1,6 @@
 // Looks up a key in a string hash's table.
-#include "core/detail/hash_table.h"
-
 #include "core/detail/hash_slot.h"
+#include "core/detail/hash_table.h"
 
 namespace tavo {
 namespace {

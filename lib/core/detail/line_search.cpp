@@ -1,11 +1,12 @@
 // Searches a file for one line.
 #include "core/detail/line_search.h"
 
+#include "tavo_error.h"
+
 #include "core/detail/fault.h"
 #include "core/detail/key_value_line.h"
 #include "core/detail/line_reader.h"
 #include "core/detail/open_file.h"
-#include "tavo_error.h"
 
 namespace tavo {
 namespace {

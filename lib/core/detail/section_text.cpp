@@ -1,8 +1,9 @@
 // Writes a section to memory.
 #include "core/detail/section_text.h"
 
-#include "core/detail/owner.h"
 #include "tavo_section.h"
+
+#include "core/detail/owner.h"
 
 #include <new>
 

@@ -1,12 +1,13 @@
 // The interface files of a bond and of its members.
 #include "network/detail/bond_files.h"
 
+#include "tavo_error.h"
+
 #include "network/detail/folder_names.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/interface_name.h"
 #include "network/detail/kernel_interface.h"
 #include "network/detail/net_command.h"
-#include "tavo_error.h"
 
 #include <algorithm>
 #include <cerrno>

@@ -1,11 +1,12 @@
 // The discovery daemon as its callers see it.
 #include "network/detail/discovery_daemon.h"
 
+#include "tavo_proc.h"
+
 #include "core/detail/open_file.h"
 #include "core/detail/text_fields.h"
 #include "network/detail/host_list.h"
 #include "network/detail/kernel_interface.h"
-#include "tavo_proc.h"
 
 #include <cerrno>
 #include <charconv>

@@ -1,11 +1,12 @@
 // Files as they were before a change, to be put back when it fails.
 #include "network/detail/file_state.h"
 
+#include "tavo_error.h"
+
 #include "core/detail/file_rewrite.h"
 #include "network/detail/folder_names.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/kernel_interface.h"
-#include "tavo_error.h"
 
 #include <algorithm>
 #include <cerrno>

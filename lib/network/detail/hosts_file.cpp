@@ -1,11 +1,12 @@
 // /etc/hosts: two lines are the appliance's, the rest is the administrator's.
 #include "network/detail/hosts_file.h"
 
+#include "tavo_error.h"
+
 #include "core/detail/file_rewrite.h"
 #include "core/detail/text_fields.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/kernel_interface.h"
-#include "tavo_error.h"
 
 #include <algorithm>
 #include <cerrno>

@@ -1,6 +1,8 @@
 // A checkpoint of the whole network.
 #include "network/detail/network_checkpoint.h"
 
+#include "tavo_error.h"
+
 #include "core/detail/appliance_paths.h"
 #include "core/detail/file_rewrite.h"
 #include "core/detail/key_value_line.h"
@@ -16,7 +18,6 @@
 #include "network/detail/live_card.h"
 #include "network/detail/process_identity.h"
 #include "network/detail/undo_action.h"
-#include "tavo_error.h"
 
 #include <algorithm>
 #include <cerrno>

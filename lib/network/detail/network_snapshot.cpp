@@ -1,8 +1,7 @@
 // The parts of the network that a checkpoint records: the steps that restore them.
-#include "network/detail/checkpoint.h"
-
 #include "core/detail/shell_command.h"
 #include "core/detail/text_fields.h"
+#include "network/detail/checkpoint.h"
 #include "network/detail/connected_route.h"
 #include "network/detail/dhcp_client.h"
 #include "network/detail/file_state.h"

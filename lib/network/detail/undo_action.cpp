@@ -1,6 +1,8 @@
 // Carries out what puts a piece of the network back.
 #include "network/detail/undo_action.h"
 
+#include "tavo_file.h"
+
 #include "core/detail/appliance_paths.h"
 #include "core/detail/keep_fault.h"
 #include "core/detail/key_value_line.h"
@@ -15,7 +17,6 @@
 #include "network/detail/kernel_interface.h"
 #include "network/detail/process_identity.h"
 #include "network/detail/wake_on_lan.h"
-#include "tavo_file.h"
 
 #include <algorithm>
 #include <charconv>

@@ -1,7 +1,6 @@
 // Reads the stored MTU of an interface.
-#include "tavo_net.h"
-
 #include "tavo_file.h"
+#include "tavo_net.h"
 
 #include "core/detail/appliance_paths.h"
 #include "core/detail/fault.h"

@@ -1,7 +1,6 @@
 // Stores the MTU of an interface; it takes effect when the interface is next configured.
-#include "tavo_net.h"
-
 #include "tavo_file.h"
+#include "tavo_net.h"
 
 #include "core/detail/appliance_paths.h"
 #include "core/detail/fault.h"

@@ -1,7 +1,6 @@
 // Checks whether an interface gets its address from DHCP.
-#include "tavo_net.h"
-
 #include "tavo_file.h"
+#include "tavo_net.h"
 
 #include "core/detail/guard.h"
 #include "core/detail/lock_hold.h"

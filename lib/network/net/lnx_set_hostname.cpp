@@ -1,7 +1,6 @@
 // Sets the host name: in the kernel, in the stored settings and in /etc/hosts.
-#include "tavo_net.h"
-
 #include "tavo_file.h"
+#include "tavo_net.h"
 
 #include "core/detail/guard.h"
 #include "core/detail/log.h"

@@ -1,7 +1,6 @@
 // Reads the stored default gateway.
-#include "tavo_net.h"
-
 #include "tavo_file.h"
+#include "tavo_net.h"
 
 #include "core/detail/fault.h"
 #include "network/detail/interface_file.h"

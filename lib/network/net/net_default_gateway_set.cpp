@@ -1,7 +1,6 @@
 // Stores the default gateway and makes it the kernel's.
-#include "tavo_net.h"
-
 #include "tavo_file.h"
+#include "tavo_net.h"
 
 #include "core/detail/guard.h"
 #include "core/detail/log.h"

@@ -1,7 +1,6 @@
 // Lets an interface wake the appliance, or no more.
-#include "tavo_net.h"
-
 #include "tavo_file.h"
+#include "tavo_net.h"
 
 #include "core/detail/appliance_paths.h"
 #include "core/detail/guard.h"

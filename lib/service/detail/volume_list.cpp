@@ -6,7 +6,6 @@
 #include "core/detail/text_fields.h"
 
 #include <algorithm>
-
 #include <climits>
 
 namespace tavo {

@@ -2,8 +2,9 @@
 #ifndef TAVO_STORAGE_DETAIL_MEMBER_SIZE_H
 #define TAVO_STORAGE_DETAIL_MEMBER_SIZE_H
 
-#include "storage/detail/disk_size.h"
 #include "tavo_raid.h"
+
+#include "storage/detail/disk_size.h"
 
 #include <cstdint>
 

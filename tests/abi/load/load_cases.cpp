@@ -1,14 +1,18 @@
 // The library as a guest that is loaded late: by dlopen, again after dlclose, in namespaces of its own; and what it loads
 // itself, when that cannot be had. This program does not link it; each case loads it in a process of its own.
+#include "tavo_bdb.h"
+#include "tavo_list.h"
+#include "tavo_str.h"
+#include "tavo_user.h"
+
 #include "core/detail/extras.h"
 #include "support/captured_log.h"
 #include "support/failing_malloc.h"
 #include "support/own_child.h"
 #include "support/scratch_dir.h"
-#include "tavo_bdb.h"
-#include "tavo_list.h"
-#include "tavo_str.h"
-#include "tavo_user.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
 
 #include <cstring>
 #include <filesystem>
@@ -16,9 +20,6 @@
 #include <dlfcn.h>
 #include <fcntl.h>
 #include <sys/resource.h>
-
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
 
 namespace {
 

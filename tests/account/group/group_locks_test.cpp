@@ -1,9 +1,9 @@
 // Changes of accounts take the locks in one order, so that they cannot deadlock, and nothing is lost when many programs
 // make them at once.
+#include "tavo_lock.h"
+
 #include "account/group/group_fixture.h"
 #include "support/rounds.h"
-
-#include "tavo_lock.h"
 
 #include <gtest/gtest.h>
 

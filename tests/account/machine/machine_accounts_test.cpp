@@ -1,11 +1,10 @@
 // The files that the library writes, read by those who live on them: the C library, the login tools, Samba.
-#include "machine_users.h"
-
-#include "support/machine.h"
-#include "support/scratch_dir.h"
-
 #include "tavo_group.h"
 #include "tavo_user.h"
+
+#include "machine_users.h"
+#include "support/machine.h"
+#include "support/scratch_dir.h"
 
 #include <gmock/gmock.h>
 

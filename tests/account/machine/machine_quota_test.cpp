@@ -1,11 +1,10 @@
 // Quotas as the kernel enforces them, on a real file system.
-#include "machine_users.h"
-
-#include "support/machine.h"
-
 #include "tavo_group.h"
 #include "tavo_quota.h"
 #include "tavo_user.h"
+
+#include "machine_users.h"
+#include "support/machine.h"
 
 #include <gmock/gmock.h>
 

@@ -1,11 +1,10 @@
 // The disk with the account files and the home folders loses its power while users are renamed and deleted, who are known to
 // every service of the appliance. After each start every file in which they are named says the same.
-#include "machine_power.h"
-
-#include "support/rounds.h"
-
 #include "tavo_group.h"
 #include "tavo_user.h"
+
+#include "machine_power.h"
+#include "support/rounds.h"
 
 #include <algorithm>
 #include <cstdio>

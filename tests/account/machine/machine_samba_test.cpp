@@ -1,12 +1,11 @@
 // Samba's own tools change their password file while the library carries batches through. Whatever a tool has reported as done
 // is there, and stays.
-#include "machine_users.h"
+#include "tavo_user.h"
 
+#include "machine_users.h"
 #include "support/machine.h"
 #include "support/rounds.h"
 #include "support/scratch_dir.h"
-
-#include "tavo_user.h"
 
 #include <algorithm>
 #include <atomic>

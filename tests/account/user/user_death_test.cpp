@@ -7,16 +7,16 @@
 
 #include <gtest/gtest.h>
 
+#include <functional>
+#include <map>
+#include <random>
+#include <set>
+
 #include <shadow.h>
 #include <signal.h>
 #include <sys/mman.h>
 #include <sys/wait.h>
 #include <unistd.h>
-
-#include <functional>
-#include <map>
-#include <random>
-#include <set>
 
 using test::AddUser;
 using test::GetUser;

@@ -8,15 +8,15 @@
 
 #include <gtest/gtest.h>
 
-#include <crypt.h>
-#include <sys/mman.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
 #include <atomic>
 #include <cstdio>
 #include <functional>
 #include <map>
+
+#include <crypt.h>
+#include <sys/mman.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
 using test::GetUser;
 

@@ -1,4 +1,5 @@
 // The user family: what is refused and what that leaves, names, ids, enumeration, expiry, hashes, follow-ups.
+#include "tavo_group.h"
 #include "tavo_lock.h"
 #include "tavo_user.h"
 
@@ -6,7 +7,6 @@
 #include "support/captured_log.h"
 #include "support/fault_state.h"
 #include "support/scenario.h"
-#include "tavo_group.h"
 
 #include <gtest/gtest.h>
 

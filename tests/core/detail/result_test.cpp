@@ -1,9 +1,9 @@
 // Codes, and values or codes, as they travel inside the library.
 #include "core/detail/result.h"
 
-#include <memory>
-
 #include <gtest/gtest.h>
+
+#include <memory>
 
 namespace {
 

@@ -1,6 +1,5 @@
 // Log lines: formats with typed arguments. No argument can break out of its line.
 #include "core/detail/log.h"
-
 #include "support/captured_log.h"
 
 #include <gtest/gtest.h>

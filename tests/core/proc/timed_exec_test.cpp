@@ -1,7 +1,6 @@
 // Running programs for a limited time.
-#include "tavo_proc.h"
-
 #include "tavo_lock.h"
+#include "tavo_proc.h"
 
 #include "support/appliance_root.h"
 #include "support/captured_log.h"

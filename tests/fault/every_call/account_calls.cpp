@@ -1,6 +1,5 @@
 // Users, groups, quotas and their stores: alice and bob, who are in the group staff.
 #include "call.h"
-
 #include "support/captured_log.h"
 #include "support/container_text.h"
 

@@ -1,6 +1,5 @@
 // The core: error state, containers, texts, settings files, locks, processes, and what the appliance says of itself.
 #include "call.h"
-
 #include "support/captured_log.h"
 #include "support/container_text.h"
 #include "support/scratch_dir.h"

@@ -2,7 +2,6 @@
 // full one, another user's file, a busy process and a signal; then each of its allocations. Whatever fails, the process
 // lives, no file is half written, and the caller learns the truth.
 #include "call.h"
-
 #include "support/appliance_root.h"
 #include "support/captured_log.h"
 #include "support/descriptors.h"

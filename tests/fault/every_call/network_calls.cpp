@@ -1,6 +1,5 @@
 // Interfaces, routes, bonds and discovery: one card with an address, as the kernel shows it.
 #include "call.h"
-
 #include "support/captured_log.h"
 #include "support/container_text.h"
 #include "support/device_tree.h"

@@ -1,6 +1,5 @@
 // Services: two volumes, the web service bound to the first, and a pid file that names this process as its daemon.
 #include "call.h"
-
 #include "support/appliance_root.h"
 #include "support/captured_log.h"
 #include "support/container_text.h"

@@ -1,7 +1,6 @@
 // Stand-ins for the programs that the library starts and for quotas: they answer at once, so that a call that starts
 // ten programs can be made a thousand times.
 #include "call.h"
-
 #include "support/captures.h"
 
 #include <cerrno>

@@ -1,6 +1,5 @@
 // Disks, partitions, arrays and volume groups: two disks with a mirror and a volume group on it, as the kernel shows them.
 #include "call.h"
-
 #include "support/captured_log.h"
 #include "support/container_text.h"
 #include "support/device_tree.h"

@@ -1,11 +1,12 @@
 // TLIBFileComment where its scratch file can be used: on the file system of /etc/skel.
+#include "tavo_file.h"
+
 #include "interposed_calls.h"
 #include "support/appliance_root.h"
 #include "support/captured_log.h"
 #include "support/failing_malloc.h"
 #include "support/fault_state.h"
 #include "support/scratch_dir.h"
-#include "tavo_file.h"
 
 #include <gmock/gmock.h>
 

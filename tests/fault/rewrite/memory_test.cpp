@@ -1,11 +1,12 @@
 // Memory runs out at any allocation, where the table of calls in every_call/ does not look: new files, the lock of the
 // system settings, and published log lines.
+#include "tavo_lock.h"
+
 #include "support/appliance_root.h"
 #include "support/captured_log.h"
 #include "support/failing_malloc.h"
 #include "support/fault_state.h"
 #include "support/scratch_dir.h"
-#include "tavo_lock.h"
 #include "writers.h"
 
 #include <gmock/gmock.h>

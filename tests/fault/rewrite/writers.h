@@ -2,9 +2,10 @@
 #ifndef TESTS_FAULT_REWRITE_WRITERS_H
 #define TESTS_FAULT_REWRITE_WRITERS_H
 
-#include "support/string_hash.h"
 #include "tavo_file.h"
 #include "tavo_section.h"
+
+#include "support/string_hash.h"
 
 #include <string>
 

@@ -1,6 +1,5 @@
 // Restores the appliance root after each test: where tests share one root, no test finds the services of another.
 #include "service_root.h"
-
 #include "support/scratch_dir.h"
 
 #include <map>

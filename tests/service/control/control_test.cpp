@@ -1,12 +1,10 @@
 // Switches services for real: stand-in daemons start, write pid files and end; /var/standin/rc.log lists every script
 // call.
+#include "tavo_file.h"
+#include "tavo_lock.h"
 #include "tavo_service.h"
 
 #include "service_root.h"
-
-#include "tavo_file.h"
-#include "tavo_lock.h"
-
 #include "support/fault_state.h"
 #include "support/scenario.h"
 #include "support/scratch_dir.h"

@@ -3,7 +3,6 @@
 #include "tavo_service.h"
 
 #include "service_root.h"
-
 #include "support/fault_state.h"
 #include "support/rounds.h"
 #include "support/scratch_dir.h"

@@ -2,7 +2,6 @@
 #include "tavo_service.h"
 
 #include "service_root.h"
-
 #include "support/container_text.h"
 #include "support/fault_state.h"
 #include "support/scratch_dir.h"

@@ -1,4 +1,5 @@
 // What mdadm and the LVM tools print, and what becomes the name of an array, a group or a volume.
+#include "core/detail/text_fields.h"
 #include "storage/detail/array_level.h"
 #include "storage/detail/array_members.h"
 #include "storage/detail/array_name.h"
@@ -6,10 +7,7 @@
 #include "storage/detail/mdadm_examine.h"
 #include "storage/detail/mount_table.h"
 #include "storage/detail/volume_name.h"
-
 #include "support/captures.h"
-
-#include "core/detail/text_fields.h"
 
 #include <gmock/gmock.h>
 

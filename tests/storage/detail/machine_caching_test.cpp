@@ -1,7 +1,6 @@
 // The write cache by SCSI's caching page, on a real drive: the way that disks on other controllers are queried.
 #include "storage/detail/caching_page.h"
 #include "storage/detail/raw_disk.h"
-
 #include "support/machine.h"
 
 #include <gmock/gmock.h>

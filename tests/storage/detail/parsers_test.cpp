@@ -1,5 +1,8 @@
 // What the kernel's files, the drives' pages and the partitioning tool say, and what becomes a name in a path or
 // command.
+#include "tavo_partition.h"
+
+#include "core/detail/text_fields.h"
 #include "storage/detail/ata_pass_through.h"
 #include "storage/detail/boot_sector.h"
 #include "storage/detail/caching_page.h"
@@ -9,11 +12,7 @@
 #include "storage/detail/proc_partitions.h"
 #include "storage/detail/sfdisk_line.h"
 #include "storage/detail/usb_id.h"
-
 #include "support/captures.h"
-
-#include "core/detail/text_fields.h"
-#include "tavo_partition.h"
 
 #include <gmock/gmock.h>
 

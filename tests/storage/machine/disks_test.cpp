@@ -1,9 +1,8 @@
 // Real disks: found, asked and commanded.
-#include "real_storage.h"
-
-#include "support/captured_log.h"
-
 #include "tavo_file.h"
+
+#include "real_storage.h"
+#include "support/captured_log.h"
 
 #include <gmock/gmock.h>
 

@@ -1,7 +1,7 @@
 // Real partition tables: every layout that was ever shipped, made and recognised.
-#include "real_storage.h"
-
 #include "tavo_file.h"
+
+#include "real_storage.h"
 
 #include <gmock/gmock.h>
 

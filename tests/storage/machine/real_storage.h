@@ -2,14 +2,14 @@
 #ifndef TESTS_STORAGE_MACHINE_REAL_STORAGE_H
 #define TESTS_STORAGE_MACHINE_REAL_STORAGE_H
 
-#include "support/container_text.h"
-#include "support/eventually.h"
-#include "support/machine.h"
-
 #include "tavo_disk.h"
 #include "tavo_lvm.h"
 #include "tavo_partition.h"
 #include "tavo_raid.h"
+
+#include "support/container_text.h"
+#include "support/eventually.h"
+#include "support/machine.h"
 
 #include <algorithm>
 #include <cstdlib>

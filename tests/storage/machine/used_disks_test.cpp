@@ -1,6 +1,5 @@
 // Real disks that were used before: they held a volume, were pulled, are large, or belong to another system.
 #include "real_storage.h"
-
 #include "support/captured_log.h"
 
 #include <gmock/gmock.h>

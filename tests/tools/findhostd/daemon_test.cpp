@@ -1,9 +1,8 @@
 // Appliances that find each other over real UDP, and attacks from the same cable, which have no effect.
-#include "packet.h"
-
 #include "tavo_fhost.h"
 #include "tavo_proc.h"
 
+#include "packet.h"
 #include "support/appliance_root.h"
 #include "support/container_text.h"
 #include "support/eventually.h"

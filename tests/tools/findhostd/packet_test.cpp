@@ -1,9 +1,10 @@
 // The discovery packets byte for byte, and the table that bounds what a network can fill.
-#include "answer_budget.h"
-#include "host_table.h"
 #include "packet.h"
 
 #include "tavo_fhost.h"
+
+#include "answer_budget.h"
+#include "host_table.h"
 
 #include <gmock/gmock.h>
 

@@ -1,6 +1,5 @@
 // tavoctl user, group and quota: their changes of the files, and refusals before any change.
 #include "run_tavoctl.h"
-
 #include "support/domain_entries.h"
 #include "support/eventually.h"
 #include "support/scratch_dir.h"

@@ -1,9 +1,8 @@
 // Rules for every registered verb of tavoctl: the exit statuses.
-#include "run_tavoctl.h"
-
-#include "support/scratch_dir.h"
-
 #include "tavo_lock.h"
+
+#include "run_tavoctl.h"
+#include "support/scratch_dir.h"
 
 #include <gmock/gmock.h>
 #include <nlohmann/json.hpp>

@@ -1,10 +1,9 @@
 // The common parts of all verbs of tavoctl: exit statuses, refusals, tables and JSON, failures, questions, completion.
-#include "run_tavoctl.h"
+#include "tavo_error.h"
 
+#include "run_tavoctl.h"
 #include "support/scratch_dir.h"
 #include "support/text_lines.h"
-
-#include "tavo_error.h"
 
 #include <gmock/gmock.h>
 #include <nlohmann/json.hpp>

@@ -1,6 +1,5 @@
 // tavoctl disk, partition, raid and lvm on real disks: what is shown is what is there, and nothing in use is destroyed.
 #include "run_tavoctl.h"
-
 #include "support/machine.h"
 
 #include <nlohmann/json.hpp>

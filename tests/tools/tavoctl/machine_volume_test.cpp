@@ -1,7 +1,6 @@
 // tavoctl storage, volume and the verbs that mend arrays, on real disks: from blank disks to a volume, through a disk
 // that is pulled, and back after everything was stopped.
 #include "run_tavoctl.h"
-
 #include "support/machine.h"
 #include "support/scratch_dir.h"
 

@@ -1,10 +1,9 @@
 // tavoctl lock run and proc: programs, their exit statuses, and who holds a lock meanwhile.
-#include "run_tavoctl.h"
+#include "tavo_lock.h"
 
+#include "run_tavoctl.h"
 #include "support/eventually.h"
 #include "support/scratch_dir.h"
-
-#include "tavo_lock.h"
 
 #include <gmock/gmock.h>
 #include <nlohmann/json.hpp>

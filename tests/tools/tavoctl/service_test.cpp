@@ -1,10 +1,9 @@
 // tavoctl service: the table, the statuses and the effects of the changing verbs, on stand-in daemons.
-#include "run_tavoctl.h"
+#include "tavo_lock.h"
 
+#include "run_tavoctl.h"
 #include "support/eventually.h"
 #include "support/scratch_dir.h"
-
-#include "tavo_lock.h"
 
 #include <gmock/gmock.h>
 #include <nlohmann/json.hpp>

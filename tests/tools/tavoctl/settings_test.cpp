@@ -1,9 +1,8 @@
 // tavoctl conf and section: their changes of the files.
-#include "run_tavoctl.h"
-
-#include "support/scratch_dir.h"
-
 #include "tavo_lock.h"
+
+#include "run_tavoctl.h"
+#include "support/scratch_dir.h"
 
 #include <gmock/gmock.h>
 #include <nlohmann/json.hpp>

@@ -1,6 +1,5 @@
 // tavoctl disk, partition, raid and lvm where there are no disks: what they refuse, what they run, what they show.
 #include "run_tavoctl.h"
-
 #include "support/captures.h"
 #include "support/hostile_names.h"
 #include "support/scenario.h"

@@ -1,6 +1,5 @@
 // tavoctl watch where the kernel is this machine's: mounts, links, addresses and services of a root of its own.
 #include "run_tavoctl.h"
-
 #include "support/appliance_root.h"
 #include "support/eventually.h"
 #include "support/machine.h"

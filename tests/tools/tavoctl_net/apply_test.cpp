@@ -1,8 +1,7 @@
 // tavoctl net apply and export: a document becomes the network, once; all of it or nothing.
-#include "net_scene.h"
-
 #include "tavo_net.h"
 
+#include "net_scene.h"
 #include "support/eventually.h"
 #include "support/rounds.h"
 

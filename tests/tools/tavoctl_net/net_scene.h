@@ -3,9 +3,8 @@
 #ifndef TESTS_TOOLS_TAVOCTL_NET_NET_SCENE_H
 #define TESTS_TOOLS_TAVOCTL_NET_NET_SCENE_H
 
-#include "tools/tavoctl/run_tavoctl.h"
-
 #include "support/network_scene.h"
+#include "tools/tavoctl/run_tavoctl.h"
 
 #include <string>
 

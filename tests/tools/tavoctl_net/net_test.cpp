@@ -1,8 +1,7 @@
 // tavoctl net and discover on cards of a kernel: what they show, refuse and change, and what they put back.
-#include "net_scene.h"
-
 #include "tavo_net.h"
 
+#include "net_scene.h"
 #include "support/eventually.h"
 #include "support/rounds.h"
 

@@ -1,8 +1,7 @@
 // tavoctl state: a document of one appliance makes another one the same, once; what is refused is refused before.
-#include "tools/tavoctl/run_tavoctl.h"
-
 #include "support/scratch_dir.h"
 #include "support/virtual_cable.h"
+#include "tools/tavoctl/run_tavoctl.h"
 
 #include <gmock/gmock.h>
 

@@ -1,12 +1,12 @@
 // Compares the text files of accounts with the stores that the library keeps of them.
 #include "account/account_check.h"
 
+#include "tavo_bdb.h"
+
 #include "account/account_key.h"
 #include "frame/failure.h"
 #include "frame/private_copy.h"
 #include "frame/terminal_text.h"
-
-#include "tavo_bdb.h"
 
 #include <cstdio>
 #include <cstdlib>

@@ -2,9 +2,9 @@
 #ifndef TAVOCTL_ACCOUNT_RULES_H
 #define TAVOCTL_ACCOUNT_RULES_H
 
-#include "frame/failure.h"
-
 #include "tavo_error.h"
+
+#include "frame/failure.h"
 
 #include <string>
 #include <utility>

@@ -1,4 +1,7 @@
 // tavoctl group: local groups.
+#include "tavo_group.h"
+#include "tavo_lock.h"
+
 #include "account/account_check.h"
 #include "account/account_plans.h"
 #include "account/account_use.h"
@@ -9,9 +12,6 @@
 #include "frame/held_locks.h"
 #include "frame/program.h"
 #include "frame/progress.h"
-
-#include "tavo_group.h"
-#include "tavo_lock.h"
 
 #include <algorithm>
 #include <fstream>

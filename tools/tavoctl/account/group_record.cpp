@@ -1,11 +1,11 @@
 // A group as tavoctl handles one.
 #include "account/group_record.h"
 
+#include "tavo_group.h"
+
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/suggestion.h"
-
-#include "tavo_group.h"
 
 #include <algorithm>
 #include <sstream>

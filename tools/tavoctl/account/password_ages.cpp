@@ -1,11 +1,11 @@
 // How long passwords are valid, and whether Samba lets an account in.
 #include "account/password_ages.h"
 
+#include "tavo_user.h"
+
 #include "account/account_check.h"
 #include "account/account_key.h"
 #include "frame/failure.h"
-
-#include "tavo_user.h"
 
 #include <charconv>
 #include <fstream>

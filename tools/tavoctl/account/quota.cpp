@@ -1,14 +1,14 @@
 // tavoctl quota: limits on the space of users on volumes.
 #include "account/quota.h"
 
+#include "tavo_quota.h"
+
 #include "account/user_record.h"
 #include "families.h"
 #include "frame/failure.h"
 #include "frame/program.h"
 #include "frame/progress.h"
 #include "storage/mounted_volumes.h"
-
-#include "tavo_quota.h"
 
 #include <cmath>
 #include <cstdlib>

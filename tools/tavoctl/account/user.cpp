@@ -1,12 +1,12 @@
 // tavoctl user: local users.
+#include "tavo_lock.h"
+
 #include "account/account_check.h"
 #include "account/account_use.h"
 #include "account/user_verbs.h"
 #include "families.h"
 #include "frame/held_locks.h"
 #include "frame/program.h"
-
-#include "tavo_lock.h"
 
 #include <limits>
 

@@ -1,13 +1,13 @@
 // A user as tavoctl handles one.
 #include "account/user_record.h"
 
+#include "tavo_group.h"
+
 #include "account/account_rules.h"
 #include "frame/containers.h"
 #include "frame/error_codes.h"
 #include "frame/failure.h"
 #include "frame/suggestion.h"
-
-#include "tavo_group.h"
 
 #include <algorithm>
 #include <charconv>

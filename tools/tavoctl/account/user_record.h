@@ -2,12 +2,12 @@
 #ifndef TAVOCTL_USER_RECORD_H
 #define TAVOCTL_USER_RECORD_H
 
+#include "tavo_user.h"
+
 #include "account/account_rules.h"
 #include "account/password_ages.h"
 #include "frame/argument_kind.h"
 #include "frame/column.h"
-
-#include "tavo_user.h"
 
 #include <optional>
 #include <string>

@@ -2,10 +2,10 @@
 #ifndef TAVOCTL_USER_VERBS_H
 #define TAVOCTL_USER_VERBS_H
 
+#include "tavo_user.h"
+
 #include "account/account_verbs.h"
 #include "account/user_record.h"
-
-#include "tavo_user.h"
 
 namespace tavoctl {
 

@@ -1,11 +1,11 @@
 // tavoctl conf: settings files, lines of key and value.
+#include "tavo_file.h"
+
 #include "families.h"
 #include "frame/failure.h"
 #include "frame/program.h"
 #include "frame/settings_file.h"
 #include "frame/suggestion.h"
-
-#include "tavo_file.h"
 
 #include <algorithm>
 

@@ -1,11 +1,11 @@
 // tavoctl error: the library's error codes.
+#include "tavo_error.h"
+
 #include "families.h"
 #include "frame/error_codes.h"
 #include "frame/failure.h"
 #include "frame/program.h"
 #include "frame/suggestion.h"
-
-#include "tavo_error.h"
 
 #include <charconv>
 

@@ -1,4 +1,6 @@
 // tavoctl lock: the locks by which the appliance's programs take turns at its files.
+#include "tavo_lock.h"
+
 #include "families.h"
 #include "frame/error_codes.h"
 #include "frame/failure.h"
@@ -6,8 +8,6 @@
 #include "frame/program.h"
 #include "frame/program_run.h"
 #include "frame/suggestion.h"
-
-#include "tavo_lock.h"
 
 #include <charconv>
 #include <sstream>

@@ -1,12 +1,12 @@
 // tavoctl proc: programs and processes.
+#include "tavo_proc.h"
+
 #include "families.h"
 #include "frame/failure.h"
 #include "frame/processes.h"
 #include "frame/program.h"
 #include "frame/program_run.h"
 #include "frame/signal_name.h"
-
-#include "tavo_proc.h"
 
 #include <array>
 #include <cerrno>

@@ -1,12 +1,12 @@
 // tavoctl section: settings files with [sections].
+#include "tavo_section.h"
+
 #include "families.h"
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/program.h"
 #include "frame/settings_file.h"
 #include "frame/suggestion.h"
-
-#include "tavo_section.h"
 
 #include <algorithm>
 

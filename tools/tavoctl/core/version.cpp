@@ -1,10 +1,10 @@
 // tavoctl version: the versions of the program and the library, and the machine.
+#include "tavo_error.h"
+
 #include "families.h"
 #include "frame/failure.h"
 #include "frame/host.h"
 #include "frame/program.h"
-
-#include "tavo_error.h"
 
 #include <cerrno>
 #include <filesystem>

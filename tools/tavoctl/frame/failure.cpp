@@ -1,11 +1,11 @@
 // How a failure reads, and which exit status it gives.
 #include "frame/failure.h"
 
+#include "tavo_error.h"
+
 #include "frame/error_codes.h"
 #include "frame/table.h"
 #include "frame/terminal_text.h"
-
-#include "tavo_error.h"
 
 #include <nlohmann/json.hpp>
 

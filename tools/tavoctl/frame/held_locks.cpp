@@ -1,10 +1,10 @@
 // Locks of the library while a verb works.
 #include "frame/held_locks.h"
 
+#include "tavo_lock.h"
+
 #include "frame/failure.h"
 #include "frame/progress.h"
-
-#include "tavo_lock.h"
 
 #include <string_view>
 

@@ -6,11 +6,11 @@
 #include "frame/unified_diff.h"
 
 #include <cerrno>
+#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
 
-#include <cstdlib>
 #include <sys/stat.h>
 #include <unistd.h>
 

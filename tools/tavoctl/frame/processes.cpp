@@ -1,9 +1,9 @@
 // Running processes, as the process table has them.
 #include "frame/processes.h"
 
-#include "frame/failure.h"
-
 #include "tavo_proc.h"
+
+#include "frame/failure.h"
 
 #include <algorithm>
 #include <ctime>

@@ -1,13 +1,13 @@
 // The way from a command line to an exit status.
 #include "frame/program.h"
 
+#include "tavo_error.h"
+
 #include "families.h"
 #include "frame/failure.h"
 #include "frame/host.h"
 #include "frame/suggestion.h"
 #include "frame/terminal_text.h"
-
-#include "tavo_error.h"
 
 #include <algorithm>
 #include <cctype>

@@ -1,14 +1,14 @@
 // The settings file that a verb of conf or section addresses.
 #include "frame/settings_file.h"
 
+#include "tavo_file.h"
+#include "tavo_lock.h"
+#include "tavo_str.h"
+
 #include "frame/containers.h"
 #include "frame/held_locks.h"
 #include "frame/host.h"
 #include "frame/private_copy.h"
-
-#include "tavo_file.h"
-#include "tavo_lock.h"
-#include "tavo_str.h"
 
 #include <cerrno>
 #include <filesystem>

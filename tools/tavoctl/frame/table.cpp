@@ -4,7 +4,6 @@
 #include "frame/terminal.h"
 #include "frame/terminal_text.h"
 
-#include <libsmartcols.h>
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
@@ -14,6 +13,8 @@
 #include <iterator>
 #include <memory>
 #include <new>
+
+#include <libsmartcols.h>
 
 namespace tavoctl {
 namespace {

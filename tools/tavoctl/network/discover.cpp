@@ -1,10 +1,10 @@
 // tavoctl discover: the appliances on the network.
+#include "tavo_fhost.h"
+
 #include "families.h"
 #include "frame/failure.h"
 #include "frame/program.h"
 #include "frame/progress.h"
-
-#include "tavo_fhost.h"
 
 #include <csignal>
 #include <iostream>

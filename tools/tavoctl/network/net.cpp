@@ -1,4 +1,6 @@
 // tavoctl net: the state of the network, and single settings of it.
+#include "tavo_net.h"
+
 #include "families.h"
 #include "frame/containers.h"
 #include "frame/failure.h"
@@ -7,8 +9,6 @@
 #include "network/net_card.h"
 #include "network/net_document.h"
 #include "network/net_verbs.h"
-
-#include "tavo_net.h"
 
 #include <algorithm>
 

@@ -1,5 +1,9 @@
 // tavoctl net export and apply: the whole network as one document.
 #include "network/net_apply.h"
+
+#include "tavo_lock.h"
+#include "tavo_net.h"
+
 #include "frame/failure.h"
 #include "frame/held_locks.h"
 #include "frame/input_file.h"
@@ -9,9 +13,6 @@
 #include "network/net_steps.h"
 #include "network/net_text.h"
 #include "network/net_verbs.h"
-
-#include "tavo_lock.h"
-#include "tavo_net.h"
 
 #include <algorithm>
 #include <cstdio>

@@ -1,10 +1,10 @@
 // tavoctl net ipv6, wol, bond: settings of one card, or of several together.
+#include "tavo_net.h"
+
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "network/net_card.h"
 #include "network/net_verbs.h"
-
-#include "tavo_net.h"
 
 #include <algorithm>
 #include <charconv>

@@ -1,10 +1,10 @@
 // A change of the network that is kept or given up as a whole.
 #include "network/net_change.h"
 
-#include "frame/failure.h"
-
 #include "tavo_net.h"
 #include "tavo_proc.h"
+
+#include "frame/failure.h"
 
 #include <algorithm>
 #include <cerrno>

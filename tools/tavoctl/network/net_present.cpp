@@ -1,15 +1,15 @@
 // The network as its files have it and as the kernel has it.
 #include "network/net_present.h"
 
+#include "tavo_file.h"
+#include "tavo_net.h"
+
 #include "frame/arguments.h"
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/input_file.h"
 #include "network/net_text.h"
 #include "network/net_verbs.h"
-
-#include "tavo_file.h"
-#include "tavo_net.h"
 
 #include <algorithm>
 #include <charconv>

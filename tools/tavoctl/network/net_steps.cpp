@@ -1,6 +1,10 @@
 // The steps from the network as it is to that of a document.
 #include "network/net_steps.h"
 
+#include "tavo_file.h"
+#include "tavo_net.h"
+#include "tavo_proc.h"
+
 #include "frame/arguments.h"
 #include "frame/containers.h"
 #include "frame/failure.h"
@@ -8,10 +12,6 @@
 #include "network/net_card.h"
 #include "network/net_present.h"
 #include "network/net_text.h"
-
-#include "tavo_file.h"
-#include "tavo_net.h"
-#include "tavo_proc.h"
 
 #include <algorithm>
 #include <csignal>

@@ -1,6 +1,9 @@
 // tavoctl service: the state of the services.
 #include "service/service.h"
 
+#include "tavo_lock.h"
+#include "tavo_service.h"
+
 #include "families.h"
 #include "frame/containers.h"
 #include "frame/failure.h"
@@ -8,9 +11,6 @@
 #include "frame/program.h"
 #include "frame/watch.h"
 #include "service/service_state.h"
-
-#include "tavo_lock.h"
-#include "tavo_service.h"
 
 namespace tavoctl {
 namespace {

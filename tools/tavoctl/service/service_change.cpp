@@ -1,11 +1,10 @@
 // tavoctl service: switching services, and where they keep their data.
-#include "service/service.h"
+#include "tavo_service.h"
 
 #include "frame/failure.h"
 #include "frame/progress.h"
+#include "service/service.h"
 #include "service/service_state.h"
-
-#include "tavo_service.h"
 
 #include <algorithm>
 #include <climits>

@@ -1,16 +1,16 @@
 // The present state of a service.
 #include "service/service_state.h"
 
+#include "tavo_file.h"
+#include "tavo_proc.h"
+#include "tavo_service.h"
+
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/host.h"
 #include "frame/processes.h"
 #include "frame/suggestion.h"
 #include "storage/mounted_volumes.h"
-
-#include "tavo_file.h"
-#include "tavo_proc.h"
-#include "tavo_service.h"
 
 #include <algorithm>
 

@@ -2,10 +2,10 @@
 #ifndef TAVOCTL_SERVICE_STATE_H
 #define TAVOCTL_SERVICE_STATE_H
 
+#include "tavo_service.h"
+
 #include "frame/argument_kind.h"
 #include "frame/column.h"
-
-#include "tavo_service.h"
 
 #include <cstdint>
 #include <optional>

@@ -1,6 +1,8 @@
 // The state of the appliance as one document.
 #include "state/state_document.h"
 
+#include "tavo_file.h"
+
 #include "account/account_plans.h"
 #include "account/quota.h"
 #include "account/user_verbs.h"
@@ -14,8 +16,6 @@
 #include "network/net_present.h"
 #include "service/service_state.h"
 #include "storage/storage_tree.h"
-
-#include "tavo_file.h"
 
 #include <algorithm>
 

@@ -1,6 +1,10 @@
 // The changes from the present state to that of a document.
 #include "state/state_plan.h"
 
+#include "tavo_file.h"
+#include "tavo_lock.h"
+#include "tavo_service.h"
+
 #include "account/account_key.h"
 #include "account/user_verbs.h"
 #include "frame/held_locks.h"
@@ -11,10 +15,6 @@
 #include "service/service_state.h"
 #include "state/account_files.h"
 #include "storage/storage_tree.h"
-
-#include "tavo_file.h"
-#include "tavo_lock.h"
-#include "tavo_service.h"
 
 #include <algorithm>
 #include <climits>

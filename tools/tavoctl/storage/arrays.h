@@ -2,9 +2,9 @@
 #ifndef TAVOCTL_ARRAYS_H
 #define TAVOCTL_ARRAYS_H
 
-#include "frame/argument_kind.h"
-
 #include "tavo_raid.h"
+
+#include "frame/argument_kind.h"
 
 #include <memory>
 #include <optional>

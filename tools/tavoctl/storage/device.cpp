@@ -1,12 +1,12 @@
 // Block devices: their names and their power state.
 #include "storage/device.h"
 
+#include "tavo_appliance.h"
+#include "tavo_partition.h"
+
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/suggestion.h"
-
-#include "tavo_appliance.h"
-#include "tavo_partition.h"
 
 #include <algorithm>
 #include <cctype>

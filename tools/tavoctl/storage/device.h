@@ -2,11 +2,11 @@
 #ifndef TAVOCTL_DEVICE_H
 #define TAVOCTL_DEVICE_H
 
+#include "tavo_disk.h"
+
 #include "frame/argument_kind.h"
 #include "frame/column.h"
 #include "frame/terminal_text.h"
-
-#include "tavo_disk.h"
 
 #include <cstdint>
 #include <optional>

@@ -1,9 +1,9 @@
 // Finds the user of a block device: a mount, swap, an array, a volume, or a program that has opened it exclusively.
+#include "tavo_error.h"
+
 #include "frame/failure.h"
 #include "frame/folder_names.h"
 #include "storage/device.h"
-
-#include "tavo_error.h"
 
 #include <cerrno>
 #include <filesystem>

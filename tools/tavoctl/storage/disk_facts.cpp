@@ -1,10 +1,10 @@
 // Disks and bays.
 #include "storage/disk_facts.h"
 
-#include "storage/nvme.h"
-
 #include "tavo_appliance.h"
 #include "tavo_partition.h"
+
+#include "storage/nvme.h"
 
 #include <algorithm>
 #include <fstream>

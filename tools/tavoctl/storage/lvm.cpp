@@ -1,12 +1,12 @@
 // tavoctl lvm: physical volumes, their groups and the volumes that fill them.
+#include "tavo_lvm.h"
+
 #include "families.h"
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/program.h"
 #include "storage/device.h"
 #include "storage/volume_groups.h"
-
-#include "tavo_lvm.h"
 
 #include <string_view>
 

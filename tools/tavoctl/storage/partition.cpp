@@ -1,12 +1,12 @@
 // tavoctl partition: the partition tables of the disks.
+#include "tavo_lvm.h"
+#include "tavo_partition.h"
+
 #include "families.h"
 #include "frame/failure.h"
 #include "frame/program.h"
 #include "storage/device.h"
 #include "storage/partitions.h"
-
-#include "tavo_lvm.h"
-#include "tavo_partition.h"
 
 #include <cstdio>
 

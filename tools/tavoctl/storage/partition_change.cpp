@@ -1,11 +1,11 @@
 // tavoctl partition: making and cleaning what a disk of the system has.
+#include "tavo_lvm.h"
+#include "tavo_partition.h"
+
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "storage/device.h"
 #include "storage/partitions.h"
-
-#include "tavo_lvm.h"
-#include "tavo_partition.h"
 
 #include <algorithm>
 

@@ -1,13 +1,12 @@
 // tavoctl raid: making, mending and stopping arrays.
-#include "storage/raid_verbs.h"
+#include "tavo_appliance.h"
 
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "storage/arrays.h"
 #include "storage/device.h"
+#include "storage/raid_verbs.h"
 #include "storage/system_tool.h"
-
-#include "tavo_appliance.h"
 
 #include <algorithm>
 

@@ -1,9 +1,9 @@
 // The SMART attributes of a drive.
 #include "storage/smart.h"
 
-#include "frame/failure.h"
-
 #include "tavo_disk.h"
+
+#include "frame/failure.h"
 
 #include <unistd.h>
 

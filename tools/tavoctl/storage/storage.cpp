@@ -1,4 +1,6 @@
 // tavoctl storage: from bay to volume in one tree.
+#include "tavo_disk.h"
+
 #include "families.h"
 #include "frame/program.h"
 #include "storage/arrays.h"
@@ -6,8 +8,6 @@
 #include "storage/partitions.h"
 #include "storage/storage_tree.h"
 #include "storage/volumes.h"
-
-#include "tavo_disk.h"
 
 #include <algorithm>
 #include <set>

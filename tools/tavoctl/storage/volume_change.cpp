@@ -1,12 +1,12 @@
 // tavoctl volume: making, mounting and growing.
+#include "tavo_lvm.h"
+
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "storage/device.h"
 #include "storage/mounted_volumes.h"
 #include "storage/volume_groups.h"
 #include "storage/volume_verbs.h"
-
-#include "tavo_lvm.h"
 
 #include <algorithm>
 #include <cerrno>

@@ -12,8 +12,9 @@
 #include <cstdio>
 #include <cstdlib>
 #include <ctime>
-#include <fcntl.h>
 #include <fstream>
+
+#include <fcntl.h>
 #include <sys/prctl.h>
 #include <unistd.h>
 

@@ -4,8 +4,9 @@
 #include <cerrno>
 #include <cstdint>
 #include <cstring>
-#include <fcntl.h>
 #include <system_error>
+
+#include <fcntl.h>
 #include <unistd.h>
 
 namespace machine {

@@ -4,6 +4,9 @@
 #include <cerrno>
 #include <cstring>
 #include <filesystem>
+#include <system_error>
+#include <utility>
+
 #include <net/if.h>
 #include <sched.h>
 #include <sys/ioctl.h>
@@ -11,9 +14,7 @@
 #include <sys/socket.h>
 #include <sys/stat.h>
 #include <sys/sysmacros.h>
-#include <system_error>
 #include <unistd.h>
-#include <utility>
 
 namespace machine {
 namespace {

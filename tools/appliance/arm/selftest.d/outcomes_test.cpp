@@ -6,6 +6,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <fstream>
+
 #include <sys/stat.h>
 #include <sys/utsname.h>
 #include <unistd.h>

@@ -4,6 +4,7 @@
 #include <fstream>
 #include <iterator>
 #include <string>
+
 #include <unistd.h>
 
 namespace {

@@ -7,6 +7,7 @@
 #include <cstring>
 
 #include <fcntl.h>
+#include <grp.h>
 #include <net/if.h>
 #include <sched.h>
 #include <sys/ioctl.h>
@@ -18,8 +19,6 @@
 #include <sys/syscall.h>
 #include <sys/wait.h>
 #include <unistd.h>
-
-#include <grp.h>
 
 namespace enter {
 namespace {
