@@ -24,7 +24,7 @@
 namespace test {
 
 // What disks held before a case. Each case runs on blank disks and on used ones: of one kind, chosen by the name of the case,
-// with TAVO_LONG_TESTS of every kind.
+// with TAVO_LONG_TESTS (run-tests --long) of every kind.
 inline constexpr const char *kLives[] = {"volume", "superblocks", "lvm", "guid_table", "file_system"};
 
 inline std::vector<std::string> Lives()
