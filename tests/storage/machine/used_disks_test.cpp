@@ -245,11 +245,9 @@ TEST_P(MachineUsedDisks, AVolumeOfFifteenTebibytes)
                     .sync = false}),
               0);
     EXPECT_EQ(ReadArray("/dev/md2")->cbArray, uint64_t{15} << 40);
-    Told("tavoctl volume create --yes 1 md2");
-    EXPECT_GT(std::stoull(Told("stat -f -c %b /volume1")) * 4, uint64_t{14} << 30) << "KiB";
-    Told("tavoctl volume unmount 1 && tavoctl volume check 1 && tavoctl lvm remove --yes vg1");
-    // The last block is there, and is not the first one.
+    // The last block is there, and is not the first one. A file system would go on writing its tables for hours.
     ASSERT_EQ(LVMCreate(test::MakeList({"/dev/md2"}).get(), "/dev/vg1", "lv", nullptr, 0), 0);
+    EXPECT_GT(std::stoull(Told("blockdev --getsize64 /dev/vg1/lv")), (uint64_t{15} << 40) - (uint64_t{8} << 20));
     Told(
         "lv=$(readlink -f /dev/vg1/lv) && last=$(($(blockdev --getsize64 $lv) / 4096 - 1)) && "
         "head -c 4096 /dev/zero >/tmp/zero && head -c 4096 /dev/urandom >/tmp/random && "
