@@ -20,7 +20,7 @@ class MachineWake : public test::MachineNetwork {
         MachineNetwork::SetUp();
         if (IsSkipped())
             return;
-        Told("modprobe e1000e && [ -d /sys/class/net/eth2 ]");
+        Told("modprobe 8139cp && [ -d /sys/class/net/eth2 ]");
         Start("DEVICE=eth0\nBOOTPROTO=none\n", "DEVICE=eth1\nBOOTPROTO=none\n", "HOSTNAME=appliance\n");
         WriteFile("/etc/tavoinfo.conf", "support_wol=\"yes\"\nwol_enabled_options=\"g\"\n");
         EXPECT_EQ(TAVONetWolSet(kCard, 0), 0);
@@ -29,7 +29,7 @@ class MachineWake : public test::MachineNetwork {
     void TearDown() override
     {
         if (test::OnMachine())
-            Told("/etc/rc.network stop; modprobe -r e1000e");
+            Told("/etc/rc.network stop; modprobe -r 8139cp");
         MachineNetwork::TearDown();
     }
 

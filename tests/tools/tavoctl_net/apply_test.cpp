@@ -117,9 +117,11 @@ class NetApply : public test::NetScene {
             EXPECT_EQ(json::parse(again.out).at("changed"), false) << text << again << exported;
 
             // The start script keeps all of it.
-            EXPECT_EQ(test::ShellStatus("/etc/rc.network stop && /etc/rc.network start"), 0);
-            EXPECT_TRUE(test::Eventually([&] { return Network() == after; })) << text << Network() << "\nbefore:\n"
-                                                                              << after;
+            if (!test::TakesLong() || text == documents.back()) {
+                EXPECT_EQ(test::ShellStatus("/etc/rc.network stop && /etc/rc.network start"), 0);
+                EXPECT_TRUE(test::Eventually([&] { return Network() == after; })) << text << Network() << "\nbefore:\n"
+                                                                                  << after;
+            }
             if (HasFailure())
                 return false;
         }

@@ -228,7 +228,7 @@ class Machine:
                         f'mac=52:54:00:00:00:0{card + 1}']
         # A third one that can wake the machine. Without its driver, which nothing loads by itself, it has no name.
         command += ['-netdev', 'hubport,hubid=1,id=cable2', '-device',
-                    'e1000e,id=eth2,romfile=,netdev=cable2,mac=52:54:00:00:00:03']
+                    'rtl8139,id=eth2,romfile=,netdev=cable2,mac=52:54:00:00:00:03']
         self.disks = []
         for bay in range(1, hardware.disks + 1):
             if self.kept:
