@@ -26,7 +26,7 @@ void Compare(const std::string &work, int size, const std::vector<Contender> &co
             for (auto _ : state)
                 benchmark::DoNotOptimize(contender.work());
         });
-        if (clock == Clock::kElapsed)
+        if (clock == Clock::elapsed)
             measured->UseRealTime();
     }
 }

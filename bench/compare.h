@@ -22,11 +22,10 @@ struct Contender {
 
 // The measure of a benchmark: wall-clock time, or CPU time, which other load on the machine disturbs less. CPU time is
 // for work that neither waits nor starts children.
-enum class Clock { kElapsed, kProcessor };
+enum class Clock { elapsed, processor };
 
 // Ends the program when the contenders do not all give the same number. The first is what the others are compared to.
-void Compare(const std::string &work, int size, const std::vector<Contender> &contenders,
-             Clock clock = Clock::kElapsed);
+void Compare(const std::string &work, int size, const std::vector<Contender> &contenders, Clock clock = Clock::elapsed);
 
 // Measures what has been compared; for main.
 int Run(int argc, char **argv);

@@ -105,7 +105,7 @@ void CompareBuild(const std::string &work, const Texts &keys, const Texts &value
                      [=] {
                          return static_cast<uint64_t>(BuildMap<AbslMap>(keys, values).size());
                      }}},
-                   bench::Clock::kProcessor);
+                   bench::Clock::processor);
 }
 
 // Adds up the first two bytes of what is found; 1 for what is not.
@@ -163,7 +163,7 @@ void CompareFind(const std::string &work, const Texts &keys, const Texts &values
                      [=] {
                          return FindAll<absl::string_view>(*absl_map, wanted);
                      }}},
-                   bench::Clock::kProcessor);
+                   bench::Clock::processor);
 }
 
 }  // namespace

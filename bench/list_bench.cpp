@@ -90,7 +90,7 @@ void CompareLists(const Texts &names)
                          g_ptr_array_free(array, TRUE);
                          return digest;
                      }}},
-                   bench::Clock::kProcessor);
+                   bench::Clock::processor);
     bench::Compare("list_push_sort_free", count,
                    {{"tavo",
                      [=] {
@@ -115,7 +115,7 @@ void CompareLists(const Texts &names)
                          g_ptr_array_free(array, TRUE);
                          return digest;
                      }}},
-                   bench::Clock::kProcessor);
+                   bench::Clock::processor);
 
     TLIBSZLIST *list = PushTavo(names);
     TLIBSzListSortItems(list, TLIB_SZLIST_SORTED);
@@ -139,7 +139,7 @@ void CompareLists(const Texts &names)
                          }
                          return found;
                      }}},
-                   bench::Clock::kProcessor);
+                   bench::Clock::processor);
 }
 
 int CompareIcu(const std::string &left, const std::string &right)
@@ -194,7 +194,7 @@ void CompareFolding(const std::string &work, const Texts &names)
                      [=] {
                          return CompareNeighbours(names, CompareFoldedGlib);
                      }}},
-                   bench::Clock::kProcessor);
+                   bench::Clock::processor);
 }
 
 }  // namespace

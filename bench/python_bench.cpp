@@ -196,13 +196,13 @@ int main(int argc, char **argv)
                     in_python("module", "check_name_module"),
                     in_python("c_name", "check_name_c_name"),
                     in_python("ctypes", "check_name_ctypes")},
-                   bench::Clock::kProcessor);
+                   bench::Clock::processor);
     bench::Compare("python_compare_texts", 1000,
                    {{"tavo", CompareTexts},
                     in_python("module", "compare_texts_module"),
                     in_python("c_name", "compare_texts_c_name"),
                     in_python("ctypes", "compare_texts_ctypes")},
-                   bench::Clock::kProcessor);
+                   bench::Clock::processor);
     bench::Compare("python_read_setting", 100,
                    {{"tavo", ReadSetting},
                     in_python("module", "read_setting_module"),

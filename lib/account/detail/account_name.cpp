@@ -51,7 +51,7 @@ bool IsDomainName(std::string_view name)
 
 bool IsDomainEntry(std::string_view key, std::string_view value, StoreContents contents)
 {
-    return IsDomainName(contents == StoreContents::kIndex ? value : key);
+    return IsDomainName(contents == StoreContents::index ? value : key);
 }
 
 std::optional<std::string> AccountKey(std::string_view name, size_t key_size)

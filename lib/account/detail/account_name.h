@@ -24,7 +24,7 @@ bool IsDotName(std::string_view name);
 bool IsDomainName(std::string_view name);  // holds a backslash
 
 // The kind of a store's entries: lines by names, or names by ids.
-enum class StoreContents { kLines, kIndex };
+enum class StoreContents { lines, index };
 
 // Returns whether an entry of a store is about a domain account. A description may hold a backslash, too.
 bool IsDomainEntry(std::string_view key, std::string_view value, StoreContents contents);

@@ -120,7 +120,7 @@ int AccountSession::Seal(Texts texts)
                 code = failed;
     stores_.clear();
     if (code == 0)
-        WriteSeal(kind_.family, texts == Texts::kWritten ? StampTexts(kind_.family) : texts_);
+        WriteSeal(kind_.family, texts == Texts::written ? StampTexts(kind_.family) : texts_);
     return code;
 }
 
@@ -130,7 +130,7 @@ int AccountSession::SealWritten()
     for (const std::unique_ptr<Btree> &store : stores_)
         stores.push_back(store.get());
     RecordSyncTimes(kind_.family, stores);
-    return Seal(Texts::kWritten);
+    return Seal(Texts::written);
 }
 
 bool AccountSession::Unlock()

@@ -52,7 +52,7 @@ class AccountSession {
     bool IsMerged() const;  // no text file has changed since
 
     // The text files at the end of a change: written from the stores, or, when nothing changed, the old ones.
-    enum class Texts { kWritten, kAsBefore };
+    enum class Texts { written, as_before };
 
     // Closes the stores and seals them: they and the text files agree. ERR_DB_CLOSE when a store could not be written;
     // then it stays unsealed.

@@ -121,7 +121,7 @@ int Btree::TakeOver(const std::map<std::string, std::string, std::less<>> &entri
     std::string_view key;
     std::string_view value;
     int code;
-    for (Entry which = Entry::kFirst; (code = Walk(which, key, value)) == 0; which = Entry::kNext)
+    for (Entry which = Entry::first; (code = Walk(which, key, value)) == 0; which = Entry::next)
         if (!entries.contains(key) && !touched_.contains(key) && !IsDomainEntry(key, value, contents))
             gone.emplace_back(key);
     if (code != ERR_DB_END)
@@ -179,7 +179,7 @@ int Btree::Step(bool skip_reserved, std::string_view &key, std::string_view &val
 
 int Btree::Walk(Entry which, std::string_view &key, std::string_view &value)
 {
-    nCursorType = which == Entry::kFirst ? TAVO_BDB_CURSOR_FIRST : TAVO_BDB_CURSOR_NEXT;
+    nCursorType = which == Entry::first ? TAVO_BDB_CURSOR_FIRST : TAVO_BDB_CURSOR_NEXT;
     return Step(true, key, value);
 }
 

@@ -14,7 +14,7 @@ int ReadEntries(Btree &store, StoreContents contents, StoreEntries &entries)
     std::string_view key;
     std::string_view value;
     int code;
-    for (Entry which = Entry::kFirst; (code = store.Walk(which, key, value)) == 0; which = Entry::kNext)
+    for (Entry which = Entry::first; (code = store.Walk(which, key, value)) == 0; which = Entry::next)
         if (IsDomainEntry(key, value, contents))
             entries.emplace(key, value);
     return code == ERR_DB_END ? 0 : code;

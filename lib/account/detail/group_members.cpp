@@ -35,7 +35,7 @@ int Collect(StoreView &groups, const MemberChange &change, std::vector<std::pair
     std::string_view key;
     std::string_view value;
     int code;
-    for (Entry which = Entry::kFirst; (code = groups.Walk(which, key, value)) == 0; which = Entry::kNext) {
+    for (Entry which = Entry::first; (code = groups.Walk(which, key, value)) == 0; which = Entry::next) {
         GroupLine group;
         if (ParseGroupLine(value, group) == 0 && ChangeMembersOf(change, group))
             lines.emplace_back(key, FormatGroupLine(group).append(1, '\0'));

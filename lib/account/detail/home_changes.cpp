@@ -17,12 +17,12 @@ void HomeChanges::TakeSteps()
         errno = 0;
         const HomeResult result = TakeHomeStep(step, stages);
         const int reason = errno;
-        if (result == HomeResult::kElsewhere)
+        if (result == HomeResult::elsewhere)
             elsewhere_.push_back(step);
-        if (result == HomeResult::kFailed)
+        if (result == HomeResult::failed)
             LogFollowUp({.home = &step, .code = reason}, where_);
         // Without a folder for homes, or when the new name is taken, trying again would be useless.
-        return result == HomeResult::kDone || (result == HomeResult::kFailed && (reason == ENOENT || reason == EEXIST));
+        return result == HomeResult::done || (result == HomeResult::failed && (reason == ENOENT || reason == EEXIST));
     });
 }
 

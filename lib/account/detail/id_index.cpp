@@ -51,7 +51,7 @@ int FindKeyById(const StoreView &index, StoreView &names, int32_t id, bool (*has
     }
     if (code != 0 && code != ERR_KEY_NOT_FOUND)
         return code;
-    for (Entry which = Entry::kFirst; (code = names.Walk(which, owner, line)) == 0; which = Entry::kNext) {
+    for (Entry which = Entry::first; (code = names.Walk(which, owner, line)) == 0; which = Entry::next) {
         if (has_id(line, id)) {
             key = owner;
             return 0;

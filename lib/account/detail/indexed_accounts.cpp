@@ -44,7 +44,7 @@ int CollectAccounts(Btree &index, Btree &names, const AccountLines &lines, Accou
     std::string_view key;
     std::string_view value;
     int code;
-    for (Entry which = Entry::kFirst; (code = index.Walk(which, key, value)) == 0; which = Entry::kNext) {
+    for (Entry which = Entry::first; (code = index.Walk(which, key, value)) == 0; which = Entry::next) {
         std::string_view line;
         code = names.Get(value, line);
         if (code == 0)
@@ -54,7 +54,7 @@ int CollectAccounts(Btree &index, Btree &names, const AccountLines &lines, Accou
     }
     if (code != ERR_DB_END)
         return code;
-    for (Entry which = Entry::kFirst; (code = names.Walk(which, key, value)) == 0; which = Entry::kNext)
+    for (Entry which = Entry::first; (code = names.Walk(which, key, value)) == 0; which = Entry::next)
         if ((code = AddAccount(key, value, lines, keys, accounts)) != 0)
             return code;
     std::stable_sort(accounts.begin(), accounts.end(),

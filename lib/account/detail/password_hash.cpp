@@ -38,7 +38,7 @@ std::string Crypt(const Extras &extras, const char *clear, const std::string &se
 std::string RandomSetting(const Extras &extras, HashMethod method)
 {
     char setting[kSaltRoom];
-    const char *made = extras.salt(method == HashMethod::kSha512 ? "$6$" : "$y$", setting);
+    const char *made = extras.salt(method == HashMethod::sha512 ? "$6$" : "$y$", setting);
     return made && *made != '*' ? made : "";
 }
 
@@ -57,8 +57,8 @@ HashMethod ConfiguredHashMethod()
     const std::optional<bool> sha512 = ReadSetting(kFactorySettings, "password_hash", "sha512");
     const std::optional<bool> yescrypt = ReadSetting(kFactorySettings, "password_hash", "yescrypt");
     if (!sha512 || !yescrypt)
-        return HashMethod::kUnknown;
-    return *sha512 ? HashMethod::kSha512 : *yescrypt ? HashMethod::kYescrypt : HashMethod::kMd5;
+        return HashMethod::unknown;
+    return *sha512 ? HashMethod::sha512 : *yescrypt ? HashMethod::yescrypt : HashMethod::md5;
 }
 
 std::string HashPassword(const char *clear, std::string_view previous, time_t now, HashMethod method)
@@ -66,7 +66,7 @@ std::string HashPassword(const char *clear, std::string_view previous, time_t no
     const Extras *extras = LoadExtras();
     if (!extras)
         return {};
-    if (method != HashMethod::kMd5) {
+    if (method != HashMethod::md5) {
         const std::string setting = RandomSetting(*extras, method);
         return setting.empty() ? setting : Crypt(*extras, clear, setting);
     }

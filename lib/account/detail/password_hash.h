@@ -15,15 +15,14 @@ std::string HashSetting(std::string_view previous, time_t now);
 
 // The methods that "password_hash" in /etc.defaults/tavoinfo.conf names. MD5-crypt is what the appliance's other
 // programs expect, and what an absent or unknown value means. kUnknown: the setting cannot be read.
-enum class HashMethod { kMd5, kSha512, kYescrypt, kUnknown };
+enum class HashMethod { md5, sha512, yescrypt, unknown };
 
 HashMethod ConfiguredHashMethod();
 
 // A hash of a new password. MD5-crypt takes its setting from HashSetting, the other methods a random salt of full
 // length from the system. Empty when the system cannot make one (a password longer than crypt takes, say). Throws
 // bad_alloc.
-std::string HashPassword(const char *clear, std::string_view previous, time_t now,
-                         HashMethod method = HashMethod::kMd5);
+std::string HashPassword(const char *clear, std::string_view previous, time_t now, HashMethod method = HashMethod::md5);
 
 }  // namespace tavo
 

@@ -23,7 +23,7 @@ struct AccountKind {
 
 inline StoreContents ContentsOf(const AccountKind &kind, size_t store)
 {
-    return store == kind.id_store ? StoreContents::kIndex : StoreContents::kLines;
+    return store == kind.id_store ? StoreContents::index : StoreContents::lines;
 }
 
 // The caller's code for stores that cannot be opened or built: lack of memory or space, else ERR_OPEN_FAILED.

@@ -9,7 +9,7 @@
 
 namespace tavo {
 
-enum class Entry { kFirst, kNext };
+enum class Entry { first, next };
 
 class StoreView {
   public:

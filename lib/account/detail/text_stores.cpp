@@ -69,7 +69,7 @@ class TextStores::Lines : public StoreView {
         if (IsSecret())
             return ERR_ACCESS_DENIED;
         const StoreEntries &entries = stores_.All(index_);
-        if (which == Entry::kFirst)
+        if (which == Entry::first)
             next_ = entries.begin();
         while (next_ != entries.end() && next_->first.starts_with('#'))
             ++next_;

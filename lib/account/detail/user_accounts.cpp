@@ -6,6 +6,7 @@
 #include "account/detail/id_index.h"
 #include "account/detail/misc_line.h"
 #include "account/detail/shadow_line.h"
+#include "account/detail/user_change.h"
 #include "account/detail/user_texts.h"
 
 namespace tavo {

@@ -5,16 +5,15 @@
 #include "tavo_user.h"
 
 #include "account/detail/passwd_line.h"
-#include "account/detail/password_hash.h"
 #include "account/detail/store_view.h"
 
-#include <ctime>
 #include <string>
 #include <string_view>
 
 namespace tavo {
 
 class AccountSession;
+struct UserChange;
 
 inline constexpr char kHomes[] = "/var/services/homes/";
 inline constexpr char kDefaultShell[] = "/bin/csh";
@@ -34,32 +33,6 @@ int ReadPrivilege(const AccountSession &session, std::string_view key, int32_t &
 
 // The key of the account with this user id: ERR_NO_SUCH_USER when there is none.
 int FindUserKey(const AccountSession &session, int32_t uid, std::string &key);
-
-// The complete new entries of one account, already checked: storing them cannot be refused.
-struct UserChange {
-    std::string old_key;   // of the account that is replaced; empty when one is added
-    std::string old_name;  // as it stood
-    int32_t old_uid = -1;
-    std::string old_hash;
-    bool keep_index = false;  // root and admin keep the index entry that they have
-    std::string key;
-    int32_t uid = -1;
-    bool new_password = false;
-    std::string passwd_line;
-    std::string misc_line;
-    std::string shadow_line;
-    std::string smb_line;
-};
-
-// How a new password is hashed.
-struct Hashing {
-    time_t now = 0;
-    HashMethod method = HashMethod::kMd5;
-};
-
-// Refuses with one of the codes of TAVOUserSet's entries; changes nothing.
-int PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user, const Hashing &hashing,
-                UserChange &change);
 
 // Fails only when a store cannot be changed; then the stores are no longer to be trusted.
 int StoreUser(const TAVOUSERDB &db, const UserChange &change);

@@ -4,6 +4,7 @@
 #include "account/detail/account_name.h"
 #include "account/detail/btree.h"
 #include "account/detail/id_index.h"
+#include "account/detail/user_change.h"
 
 namespace tavo {
 namespace {

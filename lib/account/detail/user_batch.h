@@ -2,6 +2,7 @@
 #ifndef TAVO_ACCOUNT_DETAIL_USER_BATCH_H
 #define TAVO_ACCOUNT_DETAIL_USER_BATCH_H
 
+#include "account/detail/password_hash.h"
 #include "account/detail/user_accounts.h"
 
 #include <functional>

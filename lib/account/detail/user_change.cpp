@@ -1,9 +1,10 @@
-// Works out what is to be stored for an account that is added or changed, and refuses what must not be.
+// Computes the entries of an account that is added or changed, and refuses invalid ones.
+#include "account/detail/user_change.h"
+
 #include "account/detail/account_name.h"
 #include "account/detail/btree.h"
 #include "account/detail/colon_fields.h"
 #include "account/detail/misc_line.h"
-#include "account/detail/password_hash.h"
 #include "account/detail/shadow_line.h"
 #include "account/detail/smbpasswd_line.h"
 #include "account/detail/user_accounts.h"
@@ -69,7 +70,7 @@ int ChoosePassword(const char *password, const OldUser *old, const Hashing &hash
             smb.flags = old->smb.flags;
         return 0;
     }
-    if (hashing.method == HashMethod::kUnknown)
+    if (hashing.method == HashMethod::unknown)
         return ERR_READ_FAILED;
     hash = HashPassword(password, old ? std::string_view(old->shadow.hash) : std::string_view(), hashing.now,
                         hashing.method);

@@ -70,7 +70,7 @@ int ListUsers(int flags, const KeyFilter &wanted, std::vector<std::string> &name
     std::string_view key;
     std::string_view value;
     int code;
-    for (Entry which = Entry::kFirst; (code = accounts.Walk(which, key, value)) == 0; which = Entry::kNext) {
+    for (Entry which = Entry::first; (code = accounts.Walk(which, key, value)) == 0; which = Entry::next) {
         PasswdLine account;
         if (ParsePasswdLine(value, account) != 0)
             continue;

@@ -83,24 +83,24 @@ HomeResult MakeHome(const HomeStep &step)
 {
     const Fd homes = OpenDirectory(kHomes);
     if (!homes || !IsFolderName(step.name))
-        return HomeResult::kFailed;
+        return HomeResult::failed;
     const bool made = ::mkdirat(homes.Get(), step.name.c_str(), kHomeMode) == 0;
     if (!made && errno != EEXIST)
-        return HomeResult::kFailed;
+        return HomeResult::failed;
     const Fd home(::openat(homes.Get(), step.name.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
     return home && (!made || ::fchmod(home.Get(), kHomeMode) == 0) &&
                    ::fchown(home.Get(), static_cast<uid_t>(step.uid), static_cast<gid_t>(step.gid)) == 0
-               ? HomeResult::kDone
-               : HomeResult::kFailed;
+               ? HomeResult::done
+               : HomeResult::failed;
 }
 
-// Checks whether the folder of a step still has to be moved. Returns kDone when it does not exist any more.
+// Checks whether the folder of a step still has to be moved. Returns done when it does not exist any more.
 std::optional<HomeResult> WithoutFolder(const Fd &homes, const HomeStep &step)
 {
     const uint64_t inode = InodeOf(homes, step.name);
     if (inode == step.inode)
         return std::nullopt;
-    return inode != 0 || errno == ENOENT || errno == ENOTDIR ? HomeResult::kDone : HomeResult::kFailed;
+    return inode != 0 || errno == ENOENT || errno == ENOTDIR ? HomeResult::done : HomeResult::failed;
 }
 
 HomeResult MoveHome(const HomeStep &step)
@@ -111,8 +111,8 @@ HomeResult MoveHome(const HomeStep &step)
     // Never into or over a folder that is there already.
     if (IsFolderName(step.new_name) &&
         ::renameat2(homes.Get(), step.name.c_str(), homes.Get(), step.new_name.c_str(), RENAME_NOREPLACE) == 0)
-        return HomeResult::kDone;
-    return errno == EXDEV ? HomeResult::kElsewhere : HomeResult::kFailed;
+        return HomeResult::done;
+    return errno == EXDEV ? HomeResult::elsewhere : HomeResult::failed;
 }
 
 // The staging folder, made when it is not there. Ours, not a link that leads elsewhere.
@@ -144,10 +144,10 @@ HomeResult StageHome(const HomeStep &step, const std::vector<std::string> &stage
     const std::string *stage = StageOn(VolumeOf(path), stages);
     const Fd aside = stage ? OpenStage(*stage) : Fd();
     if (!aside)
-        return HomeResult::kFailed;
+        return HomeResult::failed;
     if (::renameat(homes.Get(), step.name.c_str(), aside.Get(), step.name.c_str()) == 0)
-        return HomeResult::kDone;
-    return errno == EXDEV ? HomeResult::kElsewhere : HomeResult::kFailed;
+        return HomeResult::done;
+    return errno == EXDEV ? HomeResult::elsewhere : HomeResult::failed;
 }
 
 bool MoveByCommand(const std::string &from, const std::string &to)

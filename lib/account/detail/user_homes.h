@@ -27,9 +27,9 @@ HomePlan PlanHomes(std::span<const DoneUser> done, Marker &marker);
 HomePlan PlanRemovals(std::span<const std::string> names, Marker &marker);
 
 enum class HomeResult {
-    kDone,       // also when there is nothing to do any more
-    kFailed,     // errno says why
-    kElsewhere,  // the folder is on another file system: it is moved after the locks are released
+    done,       // also when there is nothing to do any more
+    failed,     // errno says why
+    elsewhere,  // the folder is on another file system: it is moved after the locks are released
 };
 
 // One step by one rename or mkdir.

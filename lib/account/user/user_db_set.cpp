@@ -3,6 +3,7 @@
 
 #include "account/detail/account_name.h"
 #include "account/detail/user_accounts.h"
+#include "account/detail/user_change.h"
 #include "core/detail/guard.h"
 
 extern "C" int TAVOUserDBSet(TAVOUSERDB *pDb, const char *szOldName, const TAVOUSER *pUser)

@@ -121,7 +121,7 @@ extern "C" int TAVOUserDelete(const char *const *rgszName, int nUser)
             }
         }
         if (doomed.empty()) {
-            if (change.Session().Seal(tavo::AccountSession::Texts::kAsBefore) != 0)
+            if (change.Session().Seal(tavo::AccountSession::Texts::as_before) != 0)
                 LogError("%s:%d Failed to close the account stores, errno=%d", errno);
         } else {
             TellServices(doomed);

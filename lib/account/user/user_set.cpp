@@ -91,7 +91,7 @@ extern "C" int TAVOUserSet(const char *const *rgszOldName, const TAVOUSER *const
             TAVOSchedulerHup(tavo::kReadAccountsAgain) != 0)
             LogError("%s:%d Failed to signal scheduled.");
         if (batch.Done().empty()) {
-            if (change.Session().Seal(tavo::AccountSession::Texts::kAsBefore) != 0)
+            if (change.Session().Seal(tavo::AccountSession::Texts::as_before) != 0)
                 LogError("%s:%d Failed to close the account stores, errno=%d", errno);
         } else {
             PlanFollowUp(batch.Done(), change);

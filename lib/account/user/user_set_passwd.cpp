@@ -106,7 +106,7 @@ extern "C" int TAVOUserSetPasswd(const TAVOUSER *const *rgpUser, const char *con
         }
         if (changed && tavo::CommitUsers(change) != 0)
             return -1;
-        if (!changed && change.Session().Seal(tavo::AccountSession::Texts::kAsBefore) != 0)
+        if (!changed && change.Session().Seal(tavo::AccountSession::Texts::as_before) != 0)
             LogError("%s:%d Failed to close the account stores, errno=%d", errno);
         const bool unlocked = change.End();
         TLIBScemdNotify(tavo::kAccountsChanged);

@@ -12,8 +12,8 @@ namespace {
 Matcher SearchIn(const TLIBSZLIST *b, const TLIBSZLIST *for_items_of)
 {
     if (!IsSorted(b))
-        return Matcher(b, TLIB_SZLIST_UNSORTED, Matcher::Search::kLinear);
-    return Matcher(b, b->fMode, IsSorted(for_items_of) ? Matcher::Search::kMerge : Matcher::Search::kBinary);
+        return Matcher(b, TLIB_SZLIST_UNSORTED, Matcher::Search::linear);
+    return Matcher(b, b->fMode, IsSorted(for_items_of) ? Matcher::Search::merge : Matcher::Search::binary);
 }
 
 TLIBSZLIST *SelectIntoNewList(const TLIBSZLIST *a, const TLIBSZLIST *b, bool found)
@@ -42,11 +42,11 @@ bool CanMatch(const TLIBSZLIST *a, const TLIBSZLIST *b) noexcept
 bool Matcher::Has(const char *item) noexcept
 {
     switch (search_) {
-    case Search::kBinary:
+    case Search::binary:
         return TLIBISzListFind(list_, list_->nItem - 1, 0, item, mode_ == TLIB_SZLIST_CASESORTED) >= 0;
-    case Search::kMerge:
+    case Search::merge:
         return HasByWalk(item);
-    case Search::kLinear:
+    case Search::linear:
         break;
     }
     return HasByScan(item);

@@ -13,7 +13,7 @@ bool CanMatch(const TLIBSZLIST *a, const TLIBSZLIST *b) noexcept;
 class Matcher {
   public:
     // `mode` is the order that items are compared by; any but the two sorted ones means bytewise.
-    enum class Search { kLinear, kBinary, kMerge };
+    enum class Search { linear, binary, merge };
     Matcher(const TLIBSZLIST *list, int mode, Search search) : list_(list), mode_(mode), search_(search) {}
 
     bool Has(const char *item) noexcept;

@@ -22,7 +22,7 @@ Missing MissingItems(const TLIBSZLIST *a, const TLIBSZLIST *b)
 {
     Missing missing;
     const bool walk = tavo::IsSorted(a) && tavo::IsSorted(b);
-    Matcher in_a(a, b->fMode, walk ? Matcher::Search::kMerge : Matcher::Search::kLinear);
+    Matcher in_a(a, b->fMode, walk ? Matcher::Search::merge : Matcher::Search::linear);
     for (int i = 0; i < b->nItem; ++i) {
         const char *item = b->pszItem[i];
         if (tavo::IsHole(b, i) || in_a.Has(item))

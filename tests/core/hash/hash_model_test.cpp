@@ -13,9 +13,9 @@ constexpr int kOperations = 400000;
 
 class Model {
   public:
-    enum class State { kUnused, kPair, kRemoved };
+    enum class State { unused, pair, removed };
     struct Slot {
-        State state = State::kUnused;
+        State state = State::unused;
         std::string key = {};
         std::string value = {};
     };
@@ -32,9 +32,9 @@ class Model {
         const size_t home = Home(key);
         for (size_t i = 0; i < slots.size(); ++i) {
             const size_t at = (home + i) % slots.size();
-            if (slots[at].state == State::kUnused)
+            if (slots[at].state == State::unused)
                 return -1;
-            if (slots[at].state == State::kPair && slots[at].key == key)
+            if (slots[at].state == State::pair && slots[at].key == key)
                 return static_cast<int>(at);
         }
         return -1;
@@ -45,17 +45,17 @@ class Model {
     int FreeSlot(const std::string &key) const
     {
         const size_t home = Home(key);
-        if (slots[home].state == State::kUnused)
+        if (slots[home].state == State::unused)
             return static_cast<int>(home);
         int unused = -1;
         for (size_t i = 1; i < slots.size() && unused < 0; ++i) {
             const size_t at = (home + i) % slots.size();
-            if (slots[at].state == State::kRemoved)
+            if (slots[at].state == State::removed)
                 return static_cast<int>(at);
-            if (slots[at].state == State::kUnused)
+            if (slots[at].state == State::unused)
                 unused = static_cast<int>(at);
         }
-        return slots[home].state == State::kRemoved ? static_cast<int>(home) : unused;
+        return slots[home].state == State::removed ? static_cast<int>(home) : unused;
     }
 
     int Set(const std::string &key, const std::string &value)
@@ -76,13 +76,13 @@ class Model {
         string_free -= bytes;
         ++pairs;
         at = FreeSlot(key);
-        slots[static_cast<size_t>(at)] = {State::kPair, key, value};
+        slots[static_cast<size_t>(at)] = {State::pair, key, value};
         return at;
     }
 
     void Remove(int at)
     {
-        slots[static_cast<size_t>(at)].state = State::kRemoved;
+        slots[static_cast<size_t>(at)].state = State::removed;
         --pairs;
     }
 
@@ -108,7 +108,7 @@ class Model {
         old.swap(slots);
         string_free = string_size;
         for (const Slot &slot : old) {
-            if (slot.state != State::kPair)
+            if (slot.state != State::pair)
                 continue;
             slots[static_cast<size_t>(FreeSlot(slot.key))] = slot;
             string_free -= static_cast<int>(slot.key.size() + slot.value.size()) + 2;
@@ -162,9 +162,9 @@ class Pair {
     {
         for (size_t i = 0; i < model_.slots.size(); ++i) {
             const Model::Slot &slot = model_.slots[i];
-            ASSERT_EQ(hash_->slots[i].pszKey != nullptr, slot.state == Model::State::kPair) << i;
-            ASSERT_EQ(hash_->slots[i].pszValue != nullptr, slot.state != Model::State::kUnused) << i;
-            if (slot.state == Model::State::kPair) {
+            ASSERT_EQ(hash_->slots[i].pszKey != nullptr, slot.state == Model::State::pair) << i;
+            ASSERT_EQ(hash_->slots[i].pszValue != nullptr, slot.state != Model::State::unused) << i;
+            if (slot.state == Model::State::pair) {
                 ASSERT_EQ(hash_->slots[i].pszKey, slot.key);
                 ASSERT_EQ(hash_->slots[i].pszValue, slot.value);
             }
@@ -178,8 +178,8 @@ class Pair {
     {
         PslSzHashRemoveAll(hash_.get());
         for (Model::Slot &slot : model_.slots) {
-            if (slot.state == Model::State::kPair)
-                slot.state = Model::State::kRemoved;
+            if (slot.state == Model::State::pair)
+                slot.state = Model::State::removed;
         }
         model_.pairs = 0;
         model_.string_free = model_.string_size;

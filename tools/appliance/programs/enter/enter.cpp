@@ -43,10 +43,10 @@ int main(int argc, char **argv)
 
     std::string why;
     int status = -1;
-    if (request.form != Form::Chroot)
+    if (request.form != Form::chroot)
         status = EnterNamespaces(request, &why);
-    if (status == -1 && request.form != Form::Namespaces) {
-        if (request.form == Form::Any)
+    if (status == -1 && request.form != Form::namespaces) {
+        if (request.form == Form::any)
             std::fprintf(stderr, "enter: no namespaces here (%s): chroot alone\n", why.c_str());
         status = EnterChroot(request, &why);
     }

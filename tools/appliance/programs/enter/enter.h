@@ -12,7 +12,7 @@ namespace enter {
 
 inline constexpr int exit_refused = 125;  // the root could not be entered: no status of the command
 
-enum class Form { Any, Namespaces, Chroot };
+enum class Form { any, namespaces, chroot };
 
 struct Bind {
     std::string from;
@@ -37,7 +37,7 @@ struct Request {
     std::vector<Entry> entries;
     std::vector<Bind> binds;
     std::vector<std::string> command;
-    Form form = Form::Any;
+    Form form = Form::any;
     bool keep = false;
     char *arguments = nullptr;  // the memory of our own command line
     size_t arguments_size = 0;

@@ -46,9 +46,9 @@ Bind ReadBind(const std::string &text, bool writable, const std::string &cwd)
 Form ReadForm(const std::string &name)
 {
     if (name == "namespaces")
-        return Form::Namespaces;
+        return Form::namespaces;
     if (name == "chroot")
-        return Form::Chroot;
+        return Form::chroot;
     Die("no such form: %s", name.c_str());
 }
 
