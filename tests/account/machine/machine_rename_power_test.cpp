@@ -261,8 +261,8 @@ TEST_F(MachinePower, ThePlugIsPulledWhileUsersAreRenamedAndDeleted)
     const int batches = std::max(test::Rounds(50), 8);
     const int users = batches * kBatch;
     const std::vector<Step> steps = StepsFor(batches);
-    const std::string factory = test::ReadFile("/etc.defaults/tavoinfo.conf");
-    test::WriteFile("/etc.defaults/tavoinfo.conf", factory + "netbkp=\"yes\"\n");
+    fs::create_directories("/etc.defaults");
+    test::WriteFile("/etc.defaults/tavoinfo.conf", "maxaccounts=\"2048\"\nnetbkp=\"yes\"\n");
     ASSERT_NO_FATAL_FAILURE(MakeUsers(users));
     test::PutOnPulledDisk(kFolders);
     Journal *journal = test::SharedJournal();
