@@ -88,8 +88,14 @@ void GrowMembers(Call &call, const RAIDINFO &array, const std::string &attempted
 
 void GrowSlots(Call &call, const RAIDINFO &array, const std::vector<std::string> &paths, const std::string &attempted)
 {
+    // On members of 48 MiB, which leave little room before the data, a power failure at the start of this lost data.
+    constexpr uint64_t least = uint64_t{1} << 30;
     const std::string name = array.szPath;
     const int slots = array.nSlot + static_cast<int>(paths.size());
+    if (array.fLevel != RAID_LEVEL_1 && array.cbMember < least)
+        throw Failure{.attempted = attempted,
+                      .reason = "it uses less than 1 GiB of each member, and a power failure meanwhile could damage it",
+                      .hint = "make a new array"};
     RefuseTwice(paths, attempted);
     RefuseUsed(paths, attempted);
     RefuseTooLarge(SizeToBe(array.fLevel, {}, slots, array.cbMember), attempted);
