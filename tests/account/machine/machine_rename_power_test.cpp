@@ -124,7 +124,7 @@ void MakeUsers(int users)
     ASSERT_EQ(TAVOUserSet(none.data(), records.data(), users), 0);
     ASSERT_EQ(TAVOUserSetPasswd(records.data(), hashes.data(), samba.data(), samba.data(), users), 0);
     TAVOGROUP group = {};
-    group.szName = const_cast<char *>("staff");
+    group.szName = const_cast<char *>("crew");
     group.nGid = -1;
     group.rgszMember = members.data();
     ASSERT_EQ(TAVOGroupSet(nullptr, &group), 0);
@@ -174,7 +174,10 @@ std::set<std::string> Split(const std::string &list)
 std::string After(const std::string &text, const std::string &begin)
 {
     const size_t at = text.find(begin);
-    return at == text.npos ? "" : text.substr(at + begin.size(), text.find('\n', at) - at - begin.size());
+    if (at == text.npos)
+        return "";
+    const size_t first = at + begin.size();
+    return text.substr(first, text.find('\n', first) - first);
 }
 
 std::string WrongIn(const std::map<std::string, int> &users, const std::set<std::string> &ftp)
@@ -185,8 +188,8 @@ std::string WrongIn(const std::map<std::string, int> &users, const std::set<std:
         look.Names(path, NamesIn(path));
     // Nothing is taken from this list when a user is deleted.
     look.Expect(NamesIn("/etc/ftpchroot") == ftp, "/etc/ftpchroot names other users");
-    const std::string staff = After(test::ReadFile("/etc/group"), "\nstaff:");
-    look.Names("/etc/group", Split(staff.substr(std::min(staff.rfind(':') + 1, staff.size()))));
+    const std::string crew = After(test::ReadFile("/etc/group"), "\ncrew:");
+    look.Names("/etc/group", Split(crew.substr(std::min(crew.rfind(':') + 1, crew.size()))));
     look.Names("smb.conf", Split(After(test::ReadFile("/usr/tavo/etc/smb.conf"), "valid users = ")));
     std::set<std::string> homes;
     for (const auto &home : fs::directory_iterator("/volume1/homes"))
