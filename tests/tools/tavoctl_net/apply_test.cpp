@@ -28,7 +28,8 @@ std::string Network()
 {
     return test::Output(
         "cd /etc && for f in hosts resolv.conf tavoinfo.conf sysconfig/network sysconfig/network-scripts/*; do "
-        "echo == $f; cat $f; done; hostname; ip -4 route | sort; ip -6 route | grep -v '^fe80\\|^ff' | sort; "
+        "echo == $f; cat $f; done; hostname; ip -4 route | sort; ip -6 route | grep -v '^fe80\\|^ff\\|^multicast' | "
+        "sort; "
         "for n in /sys/class/net/*; do echo ${n##*/} $(cat $n/mtu); ip addr show dev ${n##*/} | grep inet | "
         "grep -v fe80 | sed 's/ tentative//; s/ secondary//' | sort; done; cat /proc/net/vlan/config");
 }
