@@ -4,6 +4,7 @@
 #include "account/detail/account_name.h"
 #include "account/detail/commit_resume.h"
 #include "account/detail/name_caches.h"
+#include "account/detail/neighbour_files.h"
 #include "core/detail/log.h"
 
 #include <algorithm>
@@ -32,6 +33,7 @@ int AccountTransaction::Begin(unsigned locks)
     for (const StoreFamily *family : {&kUserFamily, &kGroupFamily})
         for (const TextRow &row : family->texts)
             ::unlink(row.temporary);
+    RemoveNeighbourTemporaries();
     if (!earlier.IsEmpty()) {
         commit_.Steps() = std::move(earlier);
         FinishEarlier();

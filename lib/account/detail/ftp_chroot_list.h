@@ -6,6 +6,8 @@
 
 namespace tavo {
 
+inline constexpr char kFtpChroot[] = "/etc/ftpchroot";
+
 class FtpChrootList {
   public:
     // Removes the old name, if listed, and appends the new one. Returns false when the list cannot be read.
@@ -14,7 +16,7 @@ class FtpChrootList {
     int Compose(unsigned target, AccountCommit &commit) { return names_.Compose(target, 0644, commit); }
 
   private:
-    NameLines names_{"/etc/ftpchroot"};
+    NameLines names_{kFtpChroot};
 };
 
 }  // namespace tavo

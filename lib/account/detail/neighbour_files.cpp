@@ -8,6 +8,11 @@
 #include "core/detail/appliance_paths.h"
 #include "core/detail/smb_user_lists.h"
 
+#include <cstdio>
+
+#include <limits.h>
+#include <unistd.h>
+
 namespace tavo {
 namespace {
 
@@ -76,6 +81,15 @@ int ComposeBackupUsers(const std::vector<NameStep> &steps, NetBackupUsers &backu
 }
 
 }  // namespace
+
+void RemoveNeighbourTemporaries() noexcept
+{
+    for (const char *path : {kSambaFile, kShareFile, kAfpdConf, kFtpChroot, kNetBackupUsers, kRsyncSecrets}) {
+        char temporary[PATH_MAX];
+        std::snprintf(temporary, sizeof temporary, "%s.tmp", path);
+        ::unlink(temporary);
+    }
+}
 
 int ComposeBackup(NetBackupUsers &backup, AccountCommit &commit)
 {

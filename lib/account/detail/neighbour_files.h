@@ -15,6 +15,10 @@ namespace tavo {
 int ComposeNeighbour(unsigned target, const std::vector<NameStep> &steps, NetBackupUsers &backup,
                      AccountCommit &commit);
 
+// Removes the temporary files that a process left that died before its change was decided; some hold passwords. To be
+// called with the system's lock on the account files.
+void RemoveNeighbourTemporaries() noexcept;
+
 // The credentials alone, as they were set.
 int ComposeBackup(NetBackupUsers &backup, AccountCommit &commit);
 

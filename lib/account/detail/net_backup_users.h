@@ -7,6 +7,9 @@
 
 namespace tavo {
 
+inline constexpr char kNetBackupUsers[] = "/usr/tavo/etc/netbkp.users";
+inline constexpr char kRsyncSecrets[] = "/etc/rsyncd.secrets";
+
 class NetBackupUsers {
   public:
     // Keeps the credentials of an authorised user in step: `old_name` empty for an added one, `password` in clear text,
@@ -23,8 +26,8 @@ class NetBackupUsers {
     int Compose(unsigned target, AccountCommit &commit);
 
   private:
-    NameLines authorised_{"/usr/tavo/etc/netbkp.users"};
-    NameLines secrets_{"/etc/rsyncd.secrets"};
+    NameLines authorised_{kNetBackupUsers};
+    NameLines secrets_{kRsyncSecrets};
 };
 
 }  // namespace tavo

@@ -496,6 +496,22 @@ TEST(UserStore, DisksThatFail)
     }
 }
 
+// Of a process that died before its change was decided; the ones of backup users hold passwords.
+TEST(UserStore, AChangeRemovesTheTemporaryFilesOfADeadOne)
+{
+    std::vector<std::string> left;
+    for (const char *path :
+         {"/etc/passwd", "/etc/shadow", "/etc/group_desc", "/usr/tavo/etc/smb.conf", "/usr/tavo/etc/share.conf",
+          "/usr/tavo/etc/afpd.conf", "/usr/tavo/etc/netbkp.users", "/etc/ftpchroot", "/etc/rsyncd.secrets"}) {
+        left.push_back(std::string(path) + ".tmp");
+        std::filesystem::create_directories(std::filesystem::path(path).parent_path());
+        test::WriteFile(left.back(), "half\n");
+    }
+    ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
+    for (const std::string &path : left)
+        EXPECT_FALSE(std::filesystem::exists(path)) << path;
+}
+
 // Every other file of the appliance that knows these users by name.
 void NameThemEverywhere(const std::vector<std::string> &names)
 {
