@@ -140,7 +140,9 @@ class CardSteps {
             Must(TAVONetIPv6Set(name_.c_str(), IsGiven(wanted_, "ipv6")) == 0, "switch IPv6 of " + name_);
         DropAddresses();
         if (Wants("mode") || Wants("address"))
-            SetMode();
+            SetMode(TextOf(wanted_, "mode"), TextOf(wanted_, "address"));
+        else if (wanted_.contains("vlan") && TextOf(Live(), "address").empty())
+            SetStoredMode();
         AddAddresses();
         Routes();
         Gateway();
@@ -188,9 +190,17 @@ class CardSteps {
         Run("/sbin/ifconfig " + name_ + " up", "start " + name_);
     }
 
-    void SetMode() const
+    // A VLAN with another number is another interface: it gets the address that the old one had.
+    void SetStoredMode() const
     {
-        const std::string mode = TextOf(wanted_, "mode");
+        const NetDocument stored = StoredNet();
+        const auto card = stored.cards.find(name_);
+        if (card != stored.cards.end() && TextOf(card->second, "mode") != "none")
+            SetMode(TextOf(card->second, "mode"), TextOf(card->second, "address"));
+    }
+
+    void SetMode(const std::string &mode, const std::string &address) const
+    {
         if (mode == "none")
             return SetNone();
         TAVONETCARD before = {};
@@ -199,12 +209,11 @@ class CardSteps {
         Put(card.szInterface, name_);
         card.nMode = mode == "dhcp" ? TAVO_NET_DHCP : TAVO_NET_STATIC;
         if (mode == "static") {
-            const std::string address = TextOf(wanted_, "address");
             Put(card.szIp, Before(address, '/'));
             Put(card.szMask, MaskOfLength(LengthIn(address)));
         }
         Must(TAVONetSetCard1(&card, before.szIp[0] ? &before : nullptr) == 0,
-             "give " + name_ + " the address " + (mode == "dhcp" ? mode : TextOf(wanted_, "address")));
+             "give " + name_ + " the address " + (mode == "dhcp" ? mode : address));
     }
 
     void SetNone() const
