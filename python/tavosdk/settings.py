@@ -5,7 +5,7 @@ import os
 from collections.abc import Iterator, Mapping, MutableMapping
 from typing import Any
 
-from ._core import NotFoundError, below_one, c_names, call, text_of, wraps
+from ._core import Error, NotFoundError, below_one, c_names, call, text_of, wraps
 from .hashes import StringHash
 from .lists import taken as taken_list
 
@@ -29,15 +29,16 @@ def get(path: Path, key: str, default: str | None = None) -> str | None:
 
 
 @wraps("TLIBFileSetKeyValue")
-def set(path: Path, key: str, value: str) -> None:
-    call("TLIBFileSetKeyValue", path, key, value, None)
+def set(path: Path, key: str, value: str, line: str | None = None) -> None:
+    """line: how a line is written, such as '%s="%s"' and a newline; '%s=%s' when it is not given."""
+    call("TLIBFileSetKeyValue", path, key, value, line)
 
 
 @wraps("TLIBFileSetKeys")
-def update(path: Path, pairs: Mapping[str, str]) -> None:
-    """Sets many keys in one rewrite."""
+def update(path: Path, pairs: Mapping[str, str], line: str | None = None) -> None:
+    """Sets many keys in one rewrite. line: as for set."""
     with StringHash(pairs) as given:
-        call("TLIBFileSetKeys", path, given.pointer, None)
+        call("TLIBFileSetKeys", path, given.pointer, line)
 
 
 @wraps("TLIBFileRemoveKey")
@@ -65,7 +66,8 @@ def set_system(key: str, value: str) -> None:
 
 
 class File(MutableMapping[str, str]):
-    """A settings file as a map. Nothing is kept: each look reads the file, each change rewrites it."""
+    """A settings file as a map. Nothing is kept: each look reads the file, each change rewrites it. Values are quoted
+    where all values of the file are."""
 
     def __init__(self, path: Path):
         self.path = os.fspath(path)
@@ -77,7 +79,7 @@ class File(MutableMapping[str, str]):
         return value
 
     def __setitem__(self, key: str, value: str) -> None:
-        set(self.path, key, value)
+        set(self.path, key, value, self._line())
 
     def __delitem__(self, key: str) -> None:
         try:
@@ -87,7 +89,14 @@ class File(MutableMapping[str, str]):
 
     def update(self, *pairs: Any, **more: str) -> None:
         """As a dictionary's, in one rewrite."""
-        update(self.path, dict(*pairs, **more))
+        update(self.path, dict(*pairs, **more), self._line())
+
+    def _line(self) -> str | None:
+        try:
+            settings = [line for line in lines(self.path) if "=" in line and line.lstrip()[0] not in "#;"]
+        except Error:  # a file that is not there yet
+            return None
+        return '%s="%s"\n' if settings and all('="' in line for line in settings) else None
 
     def __iter__(self) -> Iterator[str]:
         return iter(read(self.path))

@@ -176,6 +176,17 @@ class Files(unittest.TestCase):
         with self.assertRaises(tavosdk.Error):
             file["bad"] = "line\nbreak"
 
+    def test_quoted_values_stay_quoted(self):
+        path = pathlib.Path("/tmp/quoted.conf")
+        path.write_text("# kept\n\nrunssh=\"no\"\n")
+        file = tavosdk.settings.File(path)
+        file["runssh"] = "yes"
+        file.update(more="a b")
+        self.assertEqual(path.read_text(), "# kept\n\nrunssh=\"yes\"\nmore=\"a b\"\n")
+        new = pathlib.Path("/tmp/new.conf")
+        tavosdk.settings.File(new)["a"] = "1"
+        self.assertEqual(new.read_text(), "a=1\n")
+
     def test_sections(self):
         path = "/tmp/sections.conf"
         tavosdk.sections.add(path, "one", {"k": "v"})
