@@ -35,7 +35,8 @@ std::string CommandLine(pid_t pid, const std::string &beginning, std::string_vie
     return line;
 }
 
-// The process is noted when it runs, and its parent may have died just before; so the text counts, too.
+// The process is noted when it runs, and its parent may have died just before; so the text counts, too. The same command
+// that an administrator runs has called this, and waits for it.
 void KillCommand(std::string_view line)
 {
     const auto field = SplitFields(line);
@@ -50,7 +51,8 @@ void KillCommand(std::string_view line)
     constexpr int looks = 5;
     for (int i = 0; i < looks; ++i, ::usleep(10000)) {
         for (const Process &process : ListProcesses()) {
-            if (process.pid != ::getpid() && process.command.find(text) != std::string::npos)
+            if (process.pid != ::getpid() && process.command.find(text) != std::string::npos &&
+                !IsAncestor(process.pid))
                 EndProcess(process.pid, BeginningOf(process.pid));
         }
     }

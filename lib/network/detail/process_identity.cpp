@@ -13,12 +13,31 @@
 
 namespace tavo {
 
-std::string BeginningOf(pid_t pid)
+namespace {
+
+// A field of /proc/PID/stat, counted from the one that follows the name.
+std::string StatField(pid_t pid, size_t number)
 {
     const std::string stat = ReadKernelFile(("/proc/" + std::to_string(pid) + "/stat").c_str()).value_or("");
     const auto field = SplitFields(std::string_view(stat).substr(std::min(stat.rfind(')') + 1, stat.size())));
-    constexpr size_t start_time = 19;  // after the name
-    return field.size() > start_time ? std::string(field[start_time]) : "";
+    return field.size() > number ? std::string(field[number]) : "";
+}
+
+}  // namespace
+
+std::string BeginningOf(pid_t pid)
+{
+    constexpr size_t start_time = 19;
+    return StatField(pid, start_time);
+}
+
+bool IsAncestor(pid_t pid)
+{
+    constexpr size_t parent = 1;
+    pid_t found = ::getppid();
+    while (found > 1 && found != pid)
+        found = ToPid(StatField(found, parent));
+    return found == pid;
 }
 
 void EndProcess(pid_t pid, std::string_view beginning)

@@ -12,6 +12,9 @@ namespace tavo {
 // When a process began, in ticks since the system did. Empty for a process that is not there.
 std::string BeginningOf(pid_t pid);
 
+// Returns whether the caller is a descendant of that process.
+bool IsAncestor(pid_t pid);
+
 // Kills it and waits for its end, unless it is another process by now.
 void EndProcess(pid_t pid, std::string_view beginning);
 

@@ -331,6 +331,17 @@ TEST_F(Death, OnlyFilesComeBackAfterARestart)
     }));
 }
 
+// The start of the network undoes what a program left that died while it ran the same command, and is not ended as that.
+TEST_F(Death, ARestartByHandGoesOnAfterItHasUndoneWhatWasCutOff)
+{
+    EXPECT_TRUE(here_->Run([] {
+        WriteFile(kRecord, "command          0                    - /etc/rc.network start\nboot " +
+                               ReadFile("/proc/sys/kernel/random/boot_id") + "end\n");
+        return true;
+    }));
+    EXPECT_EQ(here_->Shell("/etc/rc.network stop && /etc/rc.network start && test ! -e " + std::string(kRecord)), 0);
+}
+
 }  // namespace
 
 // The seconds for which the client's end is given time.
