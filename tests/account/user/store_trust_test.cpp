@@ -7,6 +7,7 @@
 
 #include "account/user/as_nobody.h"
 #include "account/user/user_fixture.h"
+#include "support/planted_name.h"
 #include "support/rounds.h"
 
 #include <gtest/gtest.h>
@@ -175,7 +176,7 @@ TEST(StoreTrust, PlantedTreesBlockNoCall)
                 at = entry.path();
         ASSERT_TRUE(S_ISDIR(Look(at).st_mode)) << name;
     }
-    std::filesystem::remove_all(at);
+    test::RemovePlanted(at);  // deeper than a process has descriptors
     ExpectOurs();
 }
 
