@@ -36,7 +36,8 @@ bool DeleteOne(const TAVOGROUPDB &db, const char *name, Deleted &deleted)
         LogError("%s:%d Group [%s] does not exist", name ? name : "");
         return true;
     }
-    code = tavo::RemoveGroup(db, *key, group.gid);
+    if (code == 0)
+        code = tavo::RemoveGroup(db, *key, group.gid);
     if (code != 0) {
         Fail(code);
         LogError("%s:%d TAVOGroupDBDelete %s failed. tavoerr=0x%04X", name, code);
