@@ -459,7 +459,7 @@ TEST_F(Net, DiscoverListsWhoAnswers)
         ::_exit(0);
     }
     EXPECT_TRUE(here_->Run([&] {
-        test::ShellStatus("tavoctl discover --watch --json >/tmp/stream 2>&1 & echo $! >/tmp/watcher");
+        test::ShellStatus(": >/tmp/stream; tavoctl discover --watch --json >/tmp/stream 2>&1 & echo $! >/tmp/watcher");
         const auto lines = [] {
             std::vector<nlohmann::json> events;
             std::istringstream in(ReadFile("/tmp/stream"));
