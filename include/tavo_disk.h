@@ -227,7 +227,7 @@ TAVO_API int TAVODiskIsSSD(const char *szPath);
 TAVO_API int TAVOIsUSBDiskFATNoPartition(const char *szPath);
 
 /* Reads the progress of a disk's wiping job, in MiB, from /tmp/tavodd.NAME, which the job writes. Returns 0 when both
- * numbers were read; 0 with both outputs untouched when there is no such file and so no job; -1 when the line is
+ * numbers were read; 0 with both outputs unchanged when the file does not exist because no job runs; -1 when the line is
  * malformed, an argument is NULL, or the path does not end in a plain name.
  * Files: /tmp/tavodd.* */
 TAVO_API int DiskDDStatusGet(const char *szPath, uint64_t *pcMibDone, uint64_t *pcMibTotal);
@@ -236,7 +236,7 @@ TAVO_API int DiskDDStatusGet(const char *szPath, uint64_t *pcMibDone, uint64_t *
 TAVO_API void DiskPartitionsLayoutInit(TavoPartitionLayout *pLayout);
 
 /* Fills the caller's block with the partitions of the disk of kernel name szName ("sda") from /proc/partitions, and
- * sets the kind of their layout. Returns 0, also when there is no such disk (nEntry is then 0); -1, logged, when the
+ * sets the kind of their layout. Returns 0, also when the disk does not exist (nEntry is then 0); -1, logged, when the
  * file cannot be read; -1 with ERR_BAD_PARAMETERS when an argument is NULL or the name shorter than 2 characters.
  * Files: /proc/partitions */
 TAVO_API int DiskPartitionsLayoutGet(const char *szName, TavoPartitionLayout *pLayout);

@@ -2,8 +2,8 @@
  * LVM: physical volumes, volume groups and logical volumes on the data arrays.
  *
  * On models with RAID every data array is a physical volume; those of one storage space form a volume group, whose path
- * starts with "/dev/vg", and one logical volume fills it. Without RAID there is no LVM: the reading functions then find
- * nothing and run no tool.
+ * starts with "/dev/vg", and one logical volume fills it. Models without RAID do not use LVM: there the reading functions
+ * find nothing and run no tool.
  *
  * A physical volume is "/dev/" and a kernel name. A volume group is "/dev/vg" and letters, digits, "_.+-". Other text
  * is refused before any program runs. The LVM tools do all the work. Nothing is locked. Failures are logged; a code is

@@ -90,12 +90,7 @@ inline void EnsureIPv6()
 
 inline int MakeBond()
 {
-    TAVONETLINKAGGR bond = {};
-    std::strcpy(bond.szBond, "bond0");
-    bond.nMode = TAVO_NET_AGGR_BACKUP;
-    bond.nMember = 2;
-    std::strcpy(bond.rgszMember[0], "eth0");
-    std::strcpy(bond.rgszMember[1], "eth1");
+    const TAVONETLINKAGGR bond = Bond();
     return TAVONetLinkAggrSet(&bond);
 }
 

@@ -54,17 +54,6 @@ std::string Field(const std::string &line, int index)
     return field;
 }
 
-std::string Hex(const unsigned char (&hash)[16])
-{
-    std::string text;
-    for (const unsigned char byte : hash) {
-        char digits[3];
-        std::snprintf(digits, sizeof digits, "%02X", byte);
-        text += digits;
-    }
-    return text;
-}
-
 class MachineAccounts : public test::MachineTest {
   protected:
     void SetUp() override
@@ -135,7 +124,7 @@ TEST_F(MachineAccounts, SambaHashesAsTheLibraryDoes)
         const std::string line = LineOf(samba_file, name);
         unsigned char hash[16];
         ASSERT_EQ(TLIBSmbMd4Hash(password, hash), 0);
-        EXPECT_EQ(Field(line, 3), Hex(hash)) << password;
+        EXPECT_EQ(Field(line, 3), test::Hex(hash)) << password;
         // What Samba changed stays when the library writes the file the next time.
         test::DeleteUsers({"next"});
         ASSERT_EQ(AddUser("next", "p"), 0);

@@ -92,17 +92,6 @@ std::map<std::string, Account> Stored()
     return found;
 }
 
-std::string Hex(const unsigned char (&hash)[16])
-{
-    std::string text;
-    for (const unsigned char byte : hash) {
-        char digits[3];
-        std::snprintf(digits, sizeof digits, "%02X", byte);
-        text += digits;
-    }
-    return text;
-}
-
 // What the tools have reported.
 class Tools {
   public:
@@ -119,7 +108,7 @@ class Tools {
         if (test::Shell("printf '" + password + "\\n" + password + "\\n' | smbpasswd -c " + kConf + " -s " + name)
                 .status != 0)
             return;
-        reported_[name].nt_hash = Hex(hash);
+        reported_[name].nt_hash = test::Hex(hash);
         reported_[name].disabled = false;
         ++changes_;
     }

@@ -4,8 +4,10 @@
 
 #include "tavo_user.h"
 
+#include <cstdio>
 #include <initializer_list>
 #include <iterator>
+#include <string>
 
 namespace test {
 
@@ -13,6 +15,18 @@ namespace test {
 inline void DeleteUsers(std::initializer_list<const char *> names)
 {
     TAVOUserDelete(std::data(names), static_cast<int>(names.size()));
+}
+
+// As Samba writes a hash.
+inline std::string Hex(const unsigned char (&hash)[16])
+{
+    std::string text;
+    for (const unsigned char byte : hash) {
+        char digits[3];
+        std::snprintf(digits, sizeof digits, "%02X", byte);
+        text += digits;
+    }
+    return text;
 }
 
 }  // namespace test

@@ -1,5 +1,6 @@
 // Interfaces, routes, bonds and discovery: one card with an address, as the kernel shows it.
 #include "call.h"
+#include "network/card_record.h"
 #include "support/captured_log.h"
 #include "support/container_text.h"
 #include "support/device_tree.h"
@@ -19,6 +20,7 @@
 namespace every_call {
 namespace {
 
+using test::Bond;
 using test::MakeList;
 
 int Answer(int, unsigned long request, void *argument)
@@ -80,17 +82,6 @@ TAVONETCARD Static()
     std::strcpy(card.szIp, "192.0.2.11");
     std::strcpy(card.szMask, "255.255.255.0");
     return card;
-}
-
-TAVONETLINKAGGR Bond()
-{
-    TAVONETLINKAGGR bond = {};
-    std::strcpy(bond.szBond, "bond0");
-    bond.nMode = TAVO_NET_AGGR_BACKUP;
-    bond.nMember = 2;
-    std::strcpy(bond.rgszMember[0], "eth0");
-    std::strcpy(bond.rgszMember[1], "eth1");
-    return bond;
 }
 
 struct Found {
