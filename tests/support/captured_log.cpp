@@ -3,6 +3,7 @@
 
 #include <cstdarg>
 #include <cstdio>
+#include <utility>
 
 namespace test {
 
@@ -31,6 +32,19 @@ std::vector<std::string> CapturedLog::Texts() const
     for (const LoggedLine &line : lines_)
         texts.push_back(line.text);
     return texts;
+}
+
+std::string CapturedLog::Take()
+{
+    std::string all;
+    for (const LoggedLine &line : std::exchange(lines_, {})) {
+        all += (all.empty() ? "" : "\n") + line.text;
+        const size_t begin = all.find_first_of(":(", all.size() - line.text.size()) + 1;
+        const size_t end = all.find_first_not_of("0123456789", begin);
+        if (begin > 0 && end != begin)
+            all.replace(begin, end - begin, "#");
+    }
+    return all;
 }
 
 }  // namespace test

@@ -24,6 +24,9 @@ class CapturedLog {
 
     const std::vector<LoggedLine> &Lines() const { return lines_; }
     std::vector<std::string> Texts() const;
+    // The texts since the last call, one below the other, with "#" for the number after a module's name:
+    // "raid_stop:# Bad parameters".
+    std::string Take();
     void Clear() { lines_.clear(); }
 
     void Add(int priority, std::string text) { lines_.push_back({priority, std::move(text)}); }

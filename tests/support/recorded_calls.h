@@ -21,6 +21,12 @@ class RecordedCalls {
 
     // "sync", "fsync", "fdatasync", "sleep 10"; requests only where the test's own function notes them.
     const std::vector<std::string> &Calls() const { return calls_; }
+    std::vector<std::string> Take()  // those since the last call
+    {
+        const std::vector<std::string> calls = calls_;
+        calls_.clear();
+        return calls;
+    }
     void Note(std::string call) { calls_.push_back(std::move(call)); }
     void Clear() { calls_.clear(); }
     void OnIoctl(Request on_ioctl) { on_ioctl_ = std::move(on_ioctl); }

@@ -47,6 +47,13 @@ std::vector<std::string> RecordedCommands::Commands() const
     return commands;
 }
 
+std::vector<std::string> RecordedCommands::Take()
+{
+    std::vector<std::string> commands = Commands();
+    Clear();
+    return commands;
+}
+
 void RecordedCommands::Clear()
 {
     log_->used = 0;

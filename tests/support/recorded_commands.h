@@ -4,6 +4,7 @@
 #define TESTS_SUPPORT_RECORDED_COMMANDS_H
 
 #include <functional>
+#include <map>
 #include <string>
 #include <vector>
 
@@ -13,6 +14,12 @@ struct CommandReply {
     int status = 0;
     std::string output = {};  // at most the size of a pipe, 64 KiB
 };
+
+// As the library runs a command to whose output it does not listen.
+inline std::string Quiet(const std::string &command)
+{
+    return command + " > /dev/null 2>&1";
+}
 
 class RecordedCommands {
   public:
@@ -25,8 +32,31 @@ class RecordedCommands {
     RecordedCommands &operator=(const RecordedCommands &) = delete;
 
     std::vector<std::string> Commands() const;
+    std::vector<std::string> Take();  // those since the last call
     void Clear();
     void OnCommand(Answer answer) { answer_ = std::move(answer); }
+    // These commands print these texts; every other one ends so.
+    void Print(std::map<std::string, std::string> outputs, int other = 0)
+    {
+        answer_ = [=](const std::string &command) {
+            const auto found = outputs.find(command);
+            return found == outputs.end() ? CommandReply{other} : CommandReply{0, found->second};
+        };
+    }
+    // Every command ends so.
+    void Exit(int status)
+    {
+        answer_ = [status](const std::string &) {
+            return CommandReply{status};
+        };
+    }
+    // Only commands that contain the text end so.
+    void Fail(const std::string &part, int status = 1)
+    {
+        answer_ = [=](const std::string &command) {
+            return CommandReply{command.find(part) == command.npos ? 0 : status};
+        };
+    }
 
     [[noreturn]] void Run(const char *command);
 

@@ -23,12 +23,6 @@
 
 namespace test {
 
-// As the library runs what it does not listen to.
-inline std::string Quiet(const std::string &command)
-{
-    return command + " > /dev/null 2>&1";
-}
-
 inline const std::string kScripts = "/etc/sysconfig/network-scripts/";
 
 class Cards : public testing::Test {

@@ -6,7 +6,6 @@
 #include "support/captures.h"
 #include "support/device_tree.h"
 #include "support/fault_state.h"
-#include "support/hostile_names.h"
 #include "support/recorded_calls.h"
 #include "support/recorded_commands.h"
 
@@ -529,32 +528,6 @@ TEST_F(Layout, StaysWithinItsBlock)
         ASSERT_TRUE(std::all_of(std::begin(fenced->before), std::end(fenced->before), is_fence)) << text;
         ASSERT_TRUE(std::all_of(std::begin(fenced->after), std::end(fenced->after), is_fence)) << text;
     }
-}
-
-TEST(HostileNames, OpenNothingElseAndRunNothing)
-{
-    test::DeviceTree tree;
-    tree.Put("/proc/partitions", "   8  0  98304 sda\n");
-    const test::RecordedCalls calls;
-    const test::RecordedCommands commands;
-    const test::CapturedLog log;
-    const auto layout = std::make_unique<TavoPartitionLayout>();
-    for (const std::string &name : test::HostileNames()) {
-        char text[64] = "";
-        uint64_t number = 7;
-        DISKINFO *info = nullptr;
-        EXPECT_NE(TAVODiskUSBGetInfo(name.c_str(), &number), 0) << name;
-        EXPECT_NE(TAVOLnxDiskGetModel(name.c_str(), text, sizeof text), 0) << name;
-        EXPECT_NE(TAVODiskIsMvSocDriver(name.c_str()), 1) << name;
-        EXPECT_NE(DiskInfoGet(name.c_str(), &info), 1) << name;
-        DiskPartitionsLayoutGet(name.c_str(), layout.get());
-        EXPECT_EQ(layout->nEntry, 0) << name;
-        DiskDDStatusGet(name.c_str(), &number, &number);
-        EXPECT_EQ(number, 7u) << name;
-    }
-    EXPECT_THAT(commands.Commands(), IsEmpty());
-    for (const std::string &path : tree.Opened())
-        EXPECT_EQ(path.find(".."), path.npos) << path;
 }
 
 }  // namespace

@@ -5,7 +5,6 @@
 #include "support/captures.h"
 #include "support/container_text.h"
 #include "support/device_tree.h"
-#include "support/hostile_names.h"
 #include "support/recorded_calls.h"
 #include "support/recorded_commands.h"
 
@@ -295,41 +294,6 @@ TEST_F(Lvm, CleansUnusedDisks)
     ::unlink(marker.c_str());
     commands_.OnCommand([](const std::string &) -> test::CommandReply { return {5, ""}; });
     EXPECT_EQ(LVMCleanIllegal(), -1);
-}
-
-TEST_F(Lvm, HostileNamesRunNothing)
-{
-    ::unlink(test::kCanary);
-    const List good = MakeList({"/dev/md2"});
-    std::vector<std::string> names = test::HostileNames();
-    for (const char *group :
-         {"/dev/vg1 /etc", "/dev/vg/../../etc", "/dev/vg1;x", "/dev/vg1/lv", "/dev/vg..", "/dev/vg1\n"})
-        names.push_back(group);
-    LVMPV pv;
-    LVMVG vg;
-    char path[64];
-    for (const std::string &text : names) {
-        const char *const name = text.c_str();
-        const List bad = MakeList({text.empty() ? std::string("x") : text});
-        EXPECT_EQ(LVMPvCreate(name), -1) << name;
-        EXPECT_EQ(LVMPvRemove(name), -1) << name;
-        EXPECT_EQ(LVMPvSBGet(name, &pv), -1) << name;
-        EXPECT_EQ(LVMVgCreate(name, good.get()), -1) << name;
-        EXPECT_EQ(LVMVgCreate("/dev/vg1", bad.get()), -1) << name;
-        EXPECT_EQ(LVMVgRemove(name), -1) << name;
-        EXPECT_EQ(LVMVgRename(name, nullptr, "vg2"), -1) << name;
-        EXPECT_EQ(LVMVgRename("/dev/vg1", nullptr, name), -1) << name;
-        EXPECT_EQ(LVMVgSBGet(name, &vg), -1) << name;
-        EXPECT_EQ(LVMLvCreate(name, "lv"), -1) << name;
-        EXPECT_EQ(LVMLvCreate("/dev/vg1", name), -1) << name;
-        EXPECT_EQ(LVMCreate(bad.get(), "/dev/vg1", "lv", nullptr, 0), -1) << name;
-        EXPECT_EQ(LVMRemove(name, "lv"), -1) << name;
-        EXPECT_EQ(LVMRemoveLV(name), -1) << name;
-        EXPECT_EQ(LVMGetLVPath(name, path, sizeof path), -1) << name;
-    }
-    EXPECT_EQ(LVMVgRemove("/dev/md2"), -1);
-    EXPECT_THAT(commands_.Commands(), IsEmpty());
-    EXPECT_NE(::access(test::kCanary, F_OK), 0);
 }
 
 }  // namespace

@@ -7,7 +7,6 @@
 #include "support/container_text.h"
 #include "support/device_tree.h"
 #include "support/fault_state.h"
-#include "support/hostile_names.h"
 #include "support/recorded_commands.h"
 
 #include <gmock/gmock.h>
@@ -469,27 +468,6 @@ TEST_F(Partitions, SpecialDevices)
         EXPECT_EQ(TAVOCheckSpecialDevice("sdq1"), row.partition) << row.product;
     }
     EXPECT_EQ(TAVOCheckSpecialDevice("sda"), -1);
-}
-
-TEST_F(Partitions, HostileNamesRunNothing)
-{
-    Model("supportraid=\"yes\"\n");
-    ::unlink(test::kCanary);
-    const int version = 7;
-    const auto names = test::HostileNames();
-    ASSERT_GE(names.size(), 200u);
-    for (const std::string &name : names) {
-        EXPECT_EQ(PartitionCreate(name.c_str(), PARTITION_SYSTEM, &version), -1) << name;
-        EXPECT_EQ(PartitionClean(name.c_str(), PARTITION_SYSTEM | PARTITION_DATA), -1) << name;
-        EXPECT_EQ(PartitionCleanRAID(name.c_str(), 1), -1) << name;
-        EXPECT_EQ(PartitionAddTable(name.c_str()), -1) << name;
-        EXPECT_EQ(RCPartitionConfigs(1, name.c_str(), nullptr, nullptr), -1) << name;
-        EXPECT_EQ(BlTAVOCheckPartitionLayout(name.c_str(), 1, nullptr), 0) << name;
-        EXPECT_EQ(PartitionIsExtended(name.c_str()), 0) << name;
-        EXPECT_EQ(TAVOCheckSpecialDevice(name.c_str()), -1) << name;
-    }
-    EXPECT_THAT(commands_.Commands(), IsEmpty());
-    EXPECT_NE(::access(test::kCanary, F_OK), 0);
 }
 
 // The real tool, on an image in the place of a disk.

@@ -3,11 +3,7 @@
 #include "tavo_partition.h"
 #include "tavo_raid.h"
 
-#include "support/captured_log.h"
-#include "support/container_text.h"
-#include "support/device_tree.h"
-#include "support/recorded_calls.h"
-#include "support/recorded_commands.h"
+#include "storage/storage_scene.h"
 
 #include <gmock/gmock.h>
 
@@ -40,13 +36,12 @@ using test::MakeList;
 
 constexpr uint64_t kTib = uint64_t{1} << 40;
 
-class Reach : public testing::Test {
+class Reach : public test::StorageScene {
   protected:
     Reach()
     {
-        tree_.Put("/etc.defaults/tavoinfo.conf", "supportraid=yes\n");
-        for (const char *device : {"sda", "sda1", "sda2", "sda3", "sdb3", "sdc3", "sdd3", "md2", "md3"})
-            tree_.Put(std::string("/dev/") + device, "");
+        Model("supportraid=yes\n");
+        PutNodes({"sda", "sda1", "sda2", "sda3", "sdb3", "sdc3", "sdd3", "md2", "md3"});
         calls_.OnIoctl([this](int, unsigned long request, void *argument) {
             if (request != BLKGETSIZE64) {
                 errno = ENOTTY;
@@ -58,15 +53,13 @@ class Reach : public testing::Test {
     }
     ~Reach() override { machine_answer = nullptr; }
 
-    int Create(int level, std::initializer_list<const char *> members, int slots, uint64_t used = 0)
+    // An array of that many members, sda3 and so on.
+    static int Create(int level, size_t members, int slots, uint64_t used = 0)
     {
-        const test::List list = MakeList(std::vector<std::string>(members.begin(), members.end()));
-        RAIDREQUEST request = {};
-        request.szPath = "/dev/md2";
-        request.fLevel = level;
-        request.nSlot = slots;
-        request.cbArray = used;
-        request.pslMembers = list.get();
+        std::vector<std::string> paths = {"/dev/sda3", "/dev/sdb3", "/dev/sdc3"};
+        paths.resize(members);
+        const test::List list = MakeList(paths);
+        const RAIDREQUEST request = {"/dev/md2", nullptr, level, 0, slots, used, list.get(), 0};
         return RAIDCreate(&request);
     }
 
@@ -84,10 +77,6 @@ class Reach : public testing::Test {
 
     static constexpr const char *kReason = "is larger than the 16 TiB of one device that this system can reach";
     uint64_t device_bytes_ = 0;  // of every device
-    test::DeviceTree tree_;
-    test::CapturedLog log_;
-    test::RecordedCalls calls_;
-    test::RecordedCommands commands_;
 };
 
 TEST_F(Reach, NothingBeyondItIsMade)
@@ -105,82 +94,28 @@ TEST_F(Reach, NothingBeyondItIsMade)
         return {0, command.starts_with("/sbin/vgs") ? "  lSQfeY-dso4-NzXN-Hbdv-wh1J-WThm-cNRXi7\n" : ""};
     });
     const struct {
-        const char *what;
-        uint64_t largest;  // device that is taken
         std::function<int()> call;
+        uint64_t largest;  // device that is taken
+        const char *what;
     } rows[] = {
-        {"table", 16 * kTib,
-         [] {
-             return PartitionAddTable("/dev/sda");
-         }},
-        {"system", 16 * kTib,
-         [&] {
-             return PartitionCreate("/dev/sda", PARTITION_SYSTEM, &version);
-         }},
-        {"data", 16 * kTib,
-         [&] {
-             return PartitionCreate("/dev/sda", PARTITION_DATA, &version);
-         }},
-        {"clean", 16 * kTib,
-         [] {
-             return PartitionClean("/dev/sda", PARTITION_SYSTEM | PARTITION_DATA);
-         }},
-        {"linear", 8 * kTib,
-         [&] {
-             return Create(RAID_LEVEL_LINEAR, {"/dev/sda3", "/dev/sdb3"}, 2);
-         }},
-        {"RAID 0", 8 * kTib,
-         [&] {
-             return Create(RAID_LEVEL_0, {"/dev/sda3", "/dev/sdb3"}, 2);
-         }},
-        {"RAID 1", 16 * kTib,
-         [&] {
-             return Create(RAID_LEVEL_1, {"/dev/sda3", "/dev/sdb3"}, 2);
-         }},
-        {"a part of RAID 1", 16 * kTib,
-         [&] {
-             return Create(RAID_LEVEL_1, {"/dev/sda3", "/dev/sdb3"}, 2, kTib);
-         }},
-        {"RAID 5", 8 * kTib,
-         [&] {
-             return Create(RAID_LEVEL_5, {"/dev/sda3", "/dev/sdb3", "/dev/sdc3"}, 3);
-         }},
-        {"RAID 5, degraded", 4 * kTib,
-         [&] {
-             return Create(RAID_LEVEL_5, {"/dev/sda3", "/dev/sdb3"}, 5);
-         }},
-        {"RAID 6", 8 * kTib,
-         [&] {
-             return Create(RAID_LEVEL_6, {"/dev/sda3", "/dev/sdb3"}, 4);
-         }},
-        {"RAID 10", 8 * kTib,
-         [&] {
-             return Create(RAID_LEVEL_10, {"/dev/sda3", "/dev/sdb3"}, 4);
-         }},
-        {"longer", 8 * kTib,
-         [&] {
-             return RAIDAdd(&linear, "/dev/sdb3");
-         }},
-        {"a member", 16 * kTib,
-         [&] {
-             return RAIDAdd(&raid5, "/dev/sdd3");
-         }},
-        {"volume", 16 * kTib,
-         [] {
-             return LVMPvCreate("/dev/md2");
-         }},
-        {"group", 8 * kTib,
-         [&] {
-             return LVMVgCreate("/dev/vg1", group.get());
-         }},
-        {"all of it", 8 * kTib,
-         [&] {
-             return LVMCreate(group.get(), "/dev/vg1", "lv", nullptr, 0);
-         }},
-        {"grown", 8 * kTib,
-         [&] {
-             return LVMPvExpand(info);
-         }},
+        {[] { return PartitionAddTable("/dev/sda"); }, 16 * kTib, "table"},
+        {[&] { return PartitionCreate("/dev/sda", PARTITION_SYSTEM, &version); }, 16 * kTib, "system"},
+        {[&] { return PartitionCreate("/dev/sda", PARTITION_DATA, &version); }, 16 * kTib, "data"},
+        {[] { return PartitionClean("/dev/sda", PARTITION_SYSTEM | PARTITION_DATA); }, 16 * kTib, "clean"},
+        {[] { return Create(RAID_LEVEL_LINEAR, 2, 2); }, 8 * kTib, "linear"},
+        {[] { return Create(RAID_LEVEL_0, 2, 2); }, 8 * kTib, "RAID 0"},
+        {[] { return Create(RAID_LEVEL_1, 2, 2); }, 16 * kTib, "RAID 1"},
+        {[] { return Create(RAID_LEVEL_1, 2, 2, kTib); }, 16 * kTib, "a part of RAID 1"},
+        {[] { return Create(RAID_LEVEL_5, 3, 3); }, 8 * kTib, "RAID 5"},
+        {[] { return Create(RAID_LEVEL_5, 2, 5); }, 4 * kTib, "RAID 5, degraded"},
+        {[] { return Create(RAID_LEVEL_6, 2, 4); }, 8 * kTib, "RAID 6"},
+        {[] { return Create(RAID_LEVEL_10, 2, 4); }, 8 * kTib, "RAID 10"},
+        {[&] { return RAIDAdd(&linear, "/dev/sdb3"); }, 8 * kTib, "longer"},
+        {[&] { return RAIDAdd(&raid5, "/dev/sdd3"); }, 16 * kTib, "a member"},
+        {[] { return LVMPvCreate("/dev/md2"); }, 16 * kTib, "volume"},
+        {[&] { return LVMVgCreate("/dev/vg1", group.get()); }, 8 * kTib, "group"},
+        {[&] { return LVMCreate(group.get(), "/dev/vg1", "lv", nullptr, 0); }, 8 * kTib, "all of it"},
+        {[&] { return LVMPvExpand(info); }, 8 * kTib, "grown"},
     };
     for (const auto &row : rows) {
         SCOPED_TRACE(row.what);
