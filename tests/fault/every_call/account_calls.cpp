@@ -1,22 +1,21 @@
 // Users, groups, quotas and their stores: alice and bob, who are in the group staff.
-#include "call.h"
+#include "arguments.h"
 #include "support/captured_log.h"
-#include "support/container_text.h"
 
 #include <gtest/gtest.h>
 
 #include <ctime>
 #include <filesystem>
+#include <utility>
 
 #include <fcntl.h>
 
 namespace every_call {
 namespace {
 
-using test::MakeList;
-
 constexpr const char *kStore = "/tmp/every_call/store.db";
 constexpr const char *kDevice = "/dev/vg1/volume_1";
+constexpr const char *kNoHash = "00000000000000000000000000000000";
 
 struct OneUser {
     explicit OneUser(const char *name, int uid = -1)
@@ -26,6 +25,10 @@ struct OneUser {
     ~OneUser() { TAVOUserFree(user); }
     OneUser(const OneUser &) = delete;
     OneUser &operator=(const OneUser &) = delete;
+    operator TAVOUSER *() const { return user; }
+    operator const TAVOUSER * const *() const { return &user; }
+    TAVOUSER *Release() { return std::exchange(user, nullptr); }
+    void ShowIn(Trial &run) const { run.Show(user->nExpired); }
     TAVOUSER *user = nullptr;
 };
 
@@ -38,6 +41,8 @@ struct OneGroup {
     ~OneGroup() { TAVOGroupFree(group); }
     OneGroup(const OneGroup &) = delete;
     OneGroup &operator=(const OneGroup &) = delete;
+    operator TAVOGROUP *() const { return group; }
+    TAVOGROUP *Release() { return std::exchange(group, nullptr); }
     TAVOGROUP *group = nullptr;
 };
 
@@ -71,6 +76,8 @@ struct Store {
         if (db)
             TAVOBDbClose(db);
     }
+    operator TAVOBDB *() const { return db; }
+    TAVOBDB *Release() { return std::exchange(db, nullptr); }
 };
 
 struct UserStores {
@@ -84,6 +91,7 @@ struct UserStores {
             if (db)
                 TAVOBDbClose(db);
     }
+    operator TAVOUSERDB *() { return &all; }
 };
 
 struct GroupStores {
@@ -96,35 +104,8 @@ struct GroupStores {
             if (db)
                 TAVOBDbClose(db);
     }
+    operator TAVOGROUPDB *() { return &all; }
 };
-
-struct Names {
-    TLIBSZHASH *hash = PshTLIBSzHashAlloc(64);
-
-    Names() { TLIBSzHashSetValue(&hash, "alice", "alicia"); }
-    ~Names() { TLIBSzHashFree(hash); }
-};
-
-struct Found {
-    TLIBSZLIST *list = MakeList({}).release();
-
-    ~Found() { TLIBSzListFree(list); }
-};
-
-template <class Function, class... Args>
-void OnStore(Trial &run, Function &function, Args... args)
-{
-    const Store store;
-    run(function, store.db, args...);
-}
-
-template <class Function, class... Args>
-void IntoList(Trial &run, Function &function, Args... args)
-{
-    Found found;
-    run(function, &found.list, args...);
-    run.Show(found.list);
-}
 
 }  // namespace
 
@@ -134,294 +115,91 @@ Family AccountFamily()
         "Accounts",
         {
             // Stores.
-            CALL(TAVOBDbClose, 0,
+            CALL(TAVOBDbClose, 0, Store().Release()),
+            CALL(TAVOBDbConfSyncTimeGet, 0, Store(), Var<int32_t>()),
+            CALL(TAVOBDbConfSyncTimeSet, 0, Store(), int64_t{2000}),
+            CALL(TAVOBDbCursorGet, 0, Store(), 1, Made<TAVOBDbFree>(), Var<int>(), Made<TAVOBDbFree>(), Var<int>()),
+            CALL(TAVOBDbCursorSetType, 0, Store(), int{TAVO_BDB_CURSOR_NEXT}),
+            CALL(TAVOBDbDelete, 0, Store(), "key", 3),
+            CALL(TAVOBDbDeprecatedGet, 0, Store(), Var<int32_t>{7}),
+            CALL(TAVOBDbDeprecatedSet, 0, Store(), 1),
+            CALL(TAVOBDbDomainExpireTimeDelete, 0, Store()),
+            CALL(TAVOBDbDomainExpireTimeGet, 0, Store(), Var<int32_t>()),
+            CALL(TAVOBDbDomainExpireTimeSet, 0, Store()),
+            BODY(TAVOBDbFree, 0,
                  {
-                     Store store;
-                     run(f, store.db);
-                     store.db = nullptr;
-                 }),
-            CALL(TAVOBDbConfSyncTimeGet, 0,
-                 {
-                     const Store store;
-                     int32_t time = 0;
-                     run(f, store.db, &time);
-                     run.Show(time);
-                 }),
-            CALL(TAVOBDbConfSyncTimeSet, 0, { OnStore(run, f, int64_t{2000}); }),
-            CALL(TAVOBDbCursorGet, 0,
-                 {
-                     const Store store;
-                     void *key = nullptr;
                      void *value = nullptr;
-                     int key_length = 0;
-                     int value_length = 0;
-                     run(f, store.db, 1, &key, &key_length, &value, &value_length);
-                     run.Show(key_length);
-                     TAVOBDbFree(key);
-                     TAVOBDbFree(value);
-                 }),
-            CALL(TAVOBDbCursorSetType, 0, { OnStore(run, f, int{TAVO_BDB_CURSOR_NEXT}); }),
-            CALL(TAVOBDbDelete, 0, { OnStore(run, f, "key", 3); }),
-            CALL(TAVOBDbDeprecatedGet, 0,
-                 {
-                     const Store store;
-                     int32_t value = 7;
-                     run(f, store.db, &value);
-                     run.Show(value);
-                 }),
-            CALL(TAVOBDbDeprecatedSet, 0, { OnStore(run, f, 1); }),
-            CALL(TAVOBDbDomainExpireTimeDelete, 0, { OnStore(run, f); }),
-            CALL(TAVOBDbDomainExpireTimeGet, 0,
-                 {
-                     const Store store;
-                     int32_t time = 0;
-                     run(f, store.db, &time);
-                 }),
-            CALL(TAVOBDbDomainExpireTimeSet, 0, { OnStore(run, f); }),
-            CALL(TAVOBDbFree, 0,
-                 {
-                     const Store store;
-                     void *value = nullptr;
-                     int length = 0;
-                     TAVOBDbGet(store.db, "key", 3, &value, &length);
+                     TAVOBDbGet(Store(), "key", 3, &value, Var<int>());
                      run(f, value);
                  }),
-            CALL(TAVOBDbGet, 0,
-                 {
-                     const Store store;
-                     void *value = nullptr;
-                     int length = 0;
-                     run(f, store.db, "key", 3, &value, &length);
-                     run.Show(length);
-                     TAVOBDbFree(value);
-                 }),
-            CALL(TAVOBDbIsNeedToDomainRebuild, kAnswers, { OnStore(run, f); }),
-            CALL(TAVOBDbIsNeedToRebuild, kAnswers, { OnStore(run, f, int64_t{1000}); }),
-            CALL(TAVOBDbOpen, 0,
-                 {
-                     TAVOBDB *store = run(f, kStore, O_RDWR, 1);
-                     if (store)
-                         TAVOBDbClose(store);
-                 }),
-            CALL(TAVOBDbSet, 0, { OnStore(run, f, "another", 7, "value", 5); }),
+            CALL(TAVOBDbGet, 0, Store(), "key", 3, Made<TAVOBDbFree>(), Var<int>()),
+            CALL(TAVOBDbIsNeedToDomainRebuild, kAnswers, Store()),
+            CALL(TAVOBDbIsNeedToRebuild, kAnswers, Store(), int64_t{1000}),
+            BODY(TAVOBDbOpen, 0, { TAVOBDbClose(run(f, kStore, O_RDWR, 1)); }),
+            CALL(TAVOBDbSet, 0, Store(), "another", 7, "value", 5),
 
             // Users.
-            CALL(BlTLIBIsUserName, kZeroFails | kNoCode, { run(f, "alice"); }),
-            CALL(TAVOConfGetUserLimit, 0, { run(f); }),
-            CALL(TAVOUserAgingSet, 0, { run(f, "alice", 1, 90, 14); }),
-            CALL(TAVOUserAlloc, 0,
-                 {
-                     TAVOUSER *user = nullptr;
-                     run(f, &user, "carol", "x", -1, -1, "", "", "", -1, 0, "", 0);
-                     TAVOUserFree(user);
-                 }),
-            CALL(TAVOUserCheckExpired, 0, { run(f, "alice"); }),
-            CALL(TAVOUserDBDump, 0,
-                 {
-                     UserStores stores;
-                     run(f, &stores.all);
-                 }),
-            CALL(TAVOUserDBGetFreeUid, 0,
-                 {
-                     UserStores stores;
-                     run(f, &stores.all);
-                 }),
-            CALL(TAVOUserDBSet, 0,
-                 {
-                     UserStores stores;
-                     const OneUser one("carol", 2000);
-                     run(f, &stores.all, static_cast<const char *>(nullptr), one.user);
-                 }),
-            CALL(TAVOUserDelete, kLeavesCode,
-                 {
-                     const char *const names[] = {"bob"};
-                     run(f, names, 1);
-                 }),
-            CALL(TAVOUserEnum, 0, { IntoList(run, f, 1); }),
-            CALL(TAVOUserEnumByPrefix, 0, { IntoList(run, f, 1, "al"); }),
-            CALL(TAVOUserEnumBySubstr, 0, { IntoList(run, f, 1, "lic"); }),
-            CALL(TAVOUserExpiredDateFill, 0,
-                 {
-                     OneUser one("alice");
-                     run(f, one.user, "2037/1/31");
-                     run.Show(one.user->nExpired);
-                 }),
-            CALL(TAVOUserExpiredDateGet, 0,
-                 {
-                     const OneUser one("alice");
-                     char date[32] = "";
-                     run(f, one.user, date, 32);
-                     run.Show(date);
-                 }),
-            CALL(TAVOUserFree, 0,
-                 {
-                     TAVOUSER *user = nullptr;
-                     TAVOUserAlloc(&user, "carol", "x", -1, -1, "", "", "", -1, 0, "", 0);
-                     run(f, user);
-                 }),
-            CALL(TAVOUserGet, 0,
-                 {
-                     TAVOUSER *user = nullptr;
-                     run(f, "alice", &user);
-                     TAVOUserFree(user);
-                 }),
-            CALL(TAVOUserGetByUID, 0,
-                 {
-                     TAVOUSER *user = nullptr;
-                     run(f, 0, &user);
-                     TAVOUserFree(user);
-                 }),
-            CALL(TAVOUserGetValidUserList, 0,
-                 {
-                     const char *const names[] = {"alice", "nobody there", nullptr};
-                     char text[64] = "";
-                     run(f, names, text, 64);
-                 }),
-            CALL(TAVOUserIsExpired, 0, { run(f, 1); }),
-            CALL(TAVOUserLockSet, 0, { run(f, "alice", 1); }),
-            CALL(TAVOUserPrivilegeGet, 0, { run(f, "alice"); }),
-            CALL(TAVOUserRandomNumMap2Seed, 0, { run(f, 1); }),
-            CALL(TAVOUserRemoveTmpFiles, kAnswers, { run(f); }),
-            CALL(TAVOUserSet, kLeavesCode,
-                 {
-                     const OneUser one("carol");
-                     const char *const old_names[] = {nullptr};
-                     const TAVOUSER *const users[] = {one.user};
-                     run(f, old_names, users, 1);
-                 }),
-            CALL(TAVOUserSetOne, kLeavesCode,
-                 {
-                     const OneUser one("robert");
-                     run(f, "bob", one.user);
-                 }),
-            CALL(TAVOUserSetPasswd, kLeavesCode,
-                 {
-                     const OneUser one("alice");
-                     const TAVOUSER *const users[] = {one.user};
-                     const char *const hashes[] = {"$1$abcdefgh$NGjcfXeLg.0fo4FzMqUTu1"};
-                     const char *const lm[] = {"00000000000000000000000000000000"};
-                     const char *const nt[] = {"00000000000000000000000000000000"};
-                     run(f, users, hashes, lm, nt, 1);
-                 }),
-            CALL(TAVOUserTotalNum, 0, { run(f, 1); }),
-            CALL(TLIBSmbLmHash, 0,
-                 {
-                     unsigned char hash[16] = {};
-                     run(f, "secret", hash);
-                     run.Show(hash[0]);
-                 }),
-            CALL(TLIBSmbMd4Hash, 0,
-                 {
-                     unsigned char hash[16] = {};
-                     run(f, "secret", hash);
-                     run.Show(hash[0]);
-                 }),
+            CALL(BlTLIBIsUserName, kZeroFails | kNoCode, "alice"),
+            CALL(TAVOConfGetUserLimit, 0),
+            CALL(TAVOUserAgingSet, 0, "alice", 1, 90, 14),
+            CALL(TAVOUserAlloc, 0, Made<TAVOUserFree>(), "carol", "x", -1, -1, "", "", "", -1, 0, "", 0),
+            CALL(TAVOUserCheckExpired, 0, "alice"),
+            CALL(TAVOUserDBDump, 0, UserStores()),
+            CALL(TAVOUserDBGetFreeUid, 0, UserStores()),
+            CALL(TAVOUserDBSet, 0, UserStores(), nullptr, OneUser("carol", 2000)),
+            CALL(TAVOUserDelete, kLeavesCode, Texts{"bob"}, 1),
+            CALL(TAVOUserEnum, 0, ListOf({}), 1),
+            CALL(TAVOUserEnumByPrefix, 0, ListOf({}), 1, "al"),
+            CALL(TAVOUserEnumBySubstr, 0, ListOf({}), 1, "lic"),
+            CALL(TAVOUserExpiredDateFill, 0, OneUser("alice"), "2037/1/31"),
+            CALL(TAVOUserExpiredDateGet, 0, OneUser("alice"), Text<32>(), 32),
+            CALL(TAVOUserFree, 0, OneUser("carol").Release()),
+            CALL(TAVOUserGet, 0, "alice", Made<TAVOUserFree>()),
+            CALL(TAVOUserGetByUID, 0, 0, Made<TAVOUserFree>()),
+            CALL(TAVOUserGetValidUserList, 0, Texts{"alice", "nobody there", nullptr}, Text<64>(), 64),
+            CALL(TAVOUserIsExpired, 0, 1),
+            CALL(TAVOUserLockSet, 0, "alice", 1),
+            CALL(TAVOUserPrivilegeGet, 0, "alice"),
+            CALL(TAVOUserRandomNumMap2Seed, 0, 1),
+            CALL(TAVOUserRemoveTmpFiles, kAnswers),
+            CALL(TAVOUserSet, kLeavesCode, Texts{nullptr}, OneUser("carol"), 1),
+            CALL(TAVOUserSetOne, kLeavesCode, "bob", OneUser("robert")),
+            CALL(TAVOUserSetPasswd, kLeavesCode, OneUser("alice"), Texts{"$1$abcdefgh$NGjcfXeLg.0fo4FzMqUTu1"},
+                 Texts{kNoHash}, Texts{kNoHash}, 1),
+            CALL(TAVOUserTotalNum, 0, 1),
+            CALL(TLIBSmbLmHash, 0, "secret", Array<unsigned char, 16>()),
+            CALL(TLIBSmbMd4Hash, 0, "secret", Array<unsigned char, 16>()),
 
             // Groups.
-            CALL(BlTLIBIsGroupName, kZeroFails | kNoCode, { run(f, "staff"); }),
-            CALL(TAVOGroupAlloc, 0,
-                 {
-                     TAVOGROUP *group = nullptr;
-                     run(f, &group, "staff:x:65540:alice,bob");
-                     TAVOGroupFree(group);
-                 }),
-            CALL(TAVOGroupAlloc2, 0,
-                 {
-                     TAVOGROUP *group = nullptr;
-                     const char *const members[] = {"alice", nullptr};
-                     run(f, &group, "crew", 65541, members);
-                     TAVOGroupFree(group);
-                 }),
-            CALL(TAVOGroupDBGetFreeGid, 0,
-                 {
-                     GroupStores stores;
-                     run(f, &stores.all);
-                 }),
-            CALL(TAVOGroupDBSet, 0,
-                 {
-                     GroupStores stores;
-                     const OneGroup one("crew", 70000);
-                     run(f, &stores.all, static_cast<const char *>(nullptr), one.group);
-                 }),
-            CALL(TAVOGroupDelete, kLeavesCode,
-                 {
-                     const char *const names[] = {"staff"};
-                     run(f, names, 1);
-                 }),
-            CALL(TAVOGroupDescGet, 0,
-                 {
-                     char text[64] = "";
-                     run(f, "staff", text, 64);
-                     run.Show(text);
-                 }),
-            CALL(TAVOGroupDescSet, 0, { run(f, "staff", "new hands"); }),
-            CALL(TAVOGroupEnum, 0, { IntoList(run, f, 1); }),
-            CALL(TAVOGroupEnumByPrefix, 0, { IntoList(run, f, 1, "st"); }),
-            CALL(TAVOGroupEnumBySubstr, 0, { IntoList(run, f, 1, "taf"); }),
-            CALL(TAVOGroupFree, 0,
-                 {
-                     TAVOGROUP *group = nullptr;
-                     TAVOGroupAlloc(&group, "staff:x:65540:alice,bob");
-                     run(f, group);
-                 }),
-            CALL(TAVOGroupGet, 0,
-                 {
-                     TAVOGROUP *group = nullptr;
-                     run(f, "staff", &group);
-                     TAVOGroupFree(group);
-                 }),
-            CALL(TAVOGroupGetByGID, 0,
-                 {
-                     TAVOGROUP *group = nullptr;
-                     run(f, 0, &group);
-                     TAVOGroupFree(group);
-                 }),
-            CALL(TAVOGroupListMember, 0,
-                 {
-                     Found found;
-                     run(f, "staff", &found.list);
-                     run.Show(found.list);
-                 }),
-            CALL(TAVOGroupSet, 0,
-                 {
-                     const OneGroup one("crew");
-                     run(f, "staff", one.group);
-                 }),
-            CALL(TAVOGroupTotalNum, 0, { run(f, 1); }),
-            CALL(TAVOUserModifyGroup, 0,
-                 {
-                     const Names names;
-                     run(f, names.hash);
-                 }),
+            CALL(BlTLIBIsGroupName, kZeroFails | kNoCode, "staff"),
+            CALL(TAVOGroupAlloc, 0, Made<TAVOGroupFree>(), "staff:x:65540:alice,bob"),
+            CALL(TAVOGroupAlloc2, 0, Made<TAVOGroupFree>(), "crew", 65541, Texts{"alice", nullptr}),
+            CALL(TAVOGroupDBGetFreeGid, 0, GroupStores()),
+            CALL(TAVOGroupDBSet, 0, GroupStores(), nullptr, OneGroup("crew", 70000)),
+            CALL(TAVOGroupDelete, kLeavesCode, Texts{"staff"}, 1),
+            CALL(TAVOGroupDescGet, 0, "staff", Text<64>(), 64),
+            CALL(TAVOGroupDescSet, 0, "staff", "new hands"),
+            CALL(TAVOGroupEnum, 0, ListOf({}), 1),
+            CALL(TAVOGroupEnumByPrefix, 0, ListOf({}), 1, "st"),
+            CALL(TAVOGroupEnumBySubstr, 0, ListOf({}), 1, "taf"),
+            CALL(TAVOGroupFree, 0, OneGroup("staff").Release()),
+            CALL(TAVOGroupGet, 0, "staff", Made<TAVOGroupFree>()),
+            CALL(TAVOGroupGetByGID, 0, 0, Made<TAVOGroupFree>()),
+            CALL(TAVOGroupListMember, 0, "staff", ListOf({})),
+            CALL(TAVOGroupSet, 0, "staff", OneGroup("crew")),
+            CALL(TAVOGroupTotalNum, 0, 1),
+            CALL(TAVOUserModifyGroup, 0, HashOf({{"alice", "alicia"}})),
 
             // Quotas.
-            CALL(TAVOQuotaClean, kAnswers,
-                 {
-                     TLIBSZLIST *users = MakeList({"alice"}).release();
-                     run(f, users, kDevice);
-                     TLIBSzListFree(users);
-                 }),
-            CALL(TAVOQuotaCleanAllVols, kAnswers,
-                 {
-                     TLIBSZLIST *users = MakeList({"alice"}).release();
-                     run(f, users);
-                     TLIBSzListFree(users);
-                 }),
-            CALL(TAVOQuotaFmtGet, kAnswers, { run(f, kDevice); }),
-            CALL(TAVOQuotaGet, 0,
-                 {
-                     TAVOQUOTA quota = {};
-                     run(f, "alice", kDevice, &quota);
-                 }),
-            CALL(TAVOQuotaInit, kAnswers, { run(f, 1); }),
-            CALL(TAVOQuotaOff, kAnswers, { run(f, 1); }),
-            CALL(TAVOQuotaSet, 0,
-                 {
-                     const float limit = 10;
-                     run(f, "alice", kDevice, &limit);
-                 }),
-            CALL(TAVOSupportQUOTA, kAnswers, { run(f); }),
-            CALL(TAVOUnitTrans, 0, { run(f, 0, 1.5f); }),
+            CALL(TAVOQuotaClean, kAnswers, ListOf({"alice"}), kDevice),
+            CALL(TAVOQuotaCleanAllVols, kAnswers, ListOf({"alice"})),
+            CALL(TAVOQuotaFmtGet, kAnswers, kDevice),
+            CALL(TAVOQuotaGet, 0, "alice", kDevice, Var<TAVOQUOTA>()),
+            CALL(TAVOQuotaInit, kAnswers, 1),
+            CALL(TAVOQuotaOff, kAnswers, 1),
+            CALL(TAVOQuotaSet, 0, "alice", kDevice, Var<float>{10}),
+            CALL(TAVOSupportQUOTA, kAnswers),
+            CALL(TAVOUnitTrans, 0, 0, 1.5f),
         },
         [] { return std::make_shared<Accounts>(); },
         {"/tmp", "/etc", "/usr/tavo/etc"},

@@ -1,13 +1,13 @@
 // One call of every exported function, with real arguments: what the tests of faults go through.
 //
-// A row is the name, what is known of the function, and a body that prepares the arguments, makes the call through `run`
-// and shows the outputs:
+// A row is the name, what is known of the function, and its arguments: arguments.h has those that hold something. If they
+// do not suffice, a body prepares them, makes the call through `run` and shows the outputs:
 //
-//     CALL(TLIBFileGetKeyValue, 0, {
-//         char value[16] = "";
-//         run(f, kSettings, "runweb", value, 16, 0);
-//         run.Show(value);
-//     })
+//     CALL(TLIBFileGetKeyValue, 0, kSettings, "runweb", Text<16>(), 16, 0),
+//     BODY(TAVOErrorGetFile, kAnswers, {
+//         TLIBErrSetEx(ERR_READ_FAILED, "module", 7);
+//         run(f);
+//     }),
 #ifndef TESTS_FAULT_EVERY_CALL_CALL_H
 #define TESTS_FAULT_EVERY_CALL_CALL_H
 
@@ -57,17 +57,20 @@ class Trial {
     Trial(const Trial &) = delete;
     Trial &operator=(const Trial &) = delete;
 
+    // Makes the call, then shows its result and what it has left in its arguments.
     template <class Function, class... Args>
-    auto operator()(Function &function, Args... args)
+    auto operator()(Function &function, Args &&...args)
     {
         Begin();
         if constexpr (std::is_void_v<decltype(function(args...))>) {
             function(args...);
             End();
+            (ShowArgument(args), ...);
         } else {
             auto result = function(args...);
             End();
             Note(result);
+            (ShowArgument(args), ...);
             return result;
         }
     }
@@ -83,6 +86,13 @@ class Trial {
   private:
     void Begin();
     void End();
+
+    template <class Argument>
+    void ShowArgument(const Argument &argument)
+    {
+        if constexpr (requires { argument.ShowIn(*this); })
+            argument.ShowIn(*this);
+    }
 
     template <class Result>
     void Note(Result result)
@@ -114,13 +124,14 @@ struct Call {
     void (*body)(Trial &run);
 };
 
-#define CALL(name, flags, ...)                                                                                         \
+#define BODY(name, flags, ...)                                                                                         \
     {                                                                                                                  \
 #name, flags, [](Trial & run) {                                                                                \
             auto &f = ::name;                                                                                          \
             __VA_ARGS__                                                                                                \
         }                                                                                                              \
     }
+#define CALL(name, flags, ...) BODY(name, flags, { run(f __VA_OPT__(, ) __VA_ARGS__); })
 
 // A family's calls, and their surroundings: files, devices, daemons. These are kept until the family is done.
 struct Family {

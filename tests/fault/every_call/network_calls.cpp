@@ -1,8 +1,7 @@
 // Interfaces, routes, bonds and discovery: one card with an address, as the kernel shows it.
-#include "call.h"
+#include "arguments.h"
 #include "network/card_record.h"
 #include "support/captured_log.h"
-#include "support/container_text.h"
 #include "support/device_tree.h"
 #include "support/recorded_calls.h"
 #include "support/scratch_dir.h"
@@ -21,7 +20,6 @@ namespace every_call {
 namespace {
 
 using test::Bond;
-using test::MakeList;
 
 int Answer(int, unsigned long request, void *argument)
 {
@@ -84,12 +82,6 @@ TAVONETCARD Static()
     return card;
 }
 
-struct Found {
-    TLIBSZLIST *list = MakeList({}).release();
-
-    ~Found() { TLIBSzListFree(list); }
-};
-
 }  // namespace
 
 Family NetworkFamily()
@@ -97,168 +89,76 @@ Family NetworkFamily()
     return {
         "Network",
         {
-            CALL(BlTAVOLnxIsDHCP, kAnswers, { run(f, "eth0"); }),
-            CALL(BlTAVONetIPv6IsEnabled, kAnswers, { run(f, "eth0"); }),
-            CALL(BlTLIBIsAtom, kZeroFails | kNoCode, { run(f, "atom"); }),
-            CALL(BlTLIBIsConnected, kAnswers, { run(f, "eth0"); }),
-            CALL(BlTLIBIsDomain, kZeroFails | kNoCode, { run(f, "example.com"); }),
-            CALL(BlTLIBIsHostname, kZeroFails | kNoCode, { run(f, "tavo"); }),
-            CALL(BlTLIBIsIpAddr, kZeroFails | kNoCode, { run(f, "192.0.2.1"); }),
-            CALL(BlTLIBIsIpMask, kZeroFails | kNoCode,
-                 {
-                     char mask[] = "255.255.255.0";
-                     run(f, mask);
-                 }),
-            CALL(BlTLIBIsMailbox, kZeroFails | kNoCode, { run(f, "a@example.com"); }),
-            CALL(BlTLIBIsPortInUse, kAnswers, { run(f, 8080); }),
-            CALL(BlTLIBIsSubNet, kZeroFails | kNoCode, { run(f, "192.0.2.0/255.255.255.0"); }),
-            CALL(BlTLIBIsWorkGroupName, kZeroFails | kNoCode, { run(f, "WORKGROUP"); }),
-            CALL(BlTLIBIsv6IpAddrValid, kZeroFails | kNoCode, { run(f, "fe80::1"); }),
-            CALL(ErrTLIBIpMaskToSubnet, 0,
-                 {
-                     char in[64] = "192.0.2.1/255.255.255.0";
-                     char out[64] = "";
-                     run(f, in, out);
-                     run.Show(out);
-                 }),
-            CALL(ErrTLIBSubnetToIpMask, 0,
-                 {
-                     char in[64] = "192.0.2.0/24";
-                     char out[64] = "";
-                     run(f, in, out);
-                     run.Show(out);
-                 }),
-            CALL(TAVOConfGetMTUValue, kAnswers,
-                 {
-                     char mtu[16] = "";
-                     run(f, "eth0", mtu, 16);
-                 }),
-            CALL(TAVOConfSetMTUValue, 0, { run(f, "eth0", 1400); }),
-            CALL(TAVOGetMTUSetting, kAnswers, { run(f, "eth0"); }),
-            CALL(TAVOIIpConflict, kAnswers, { run(f, "eth0", "192.0.2.55"); }),
-            CALL(TAVOLnxGetHostname, 0,
-                 {
-                     char name[64] = "";
-                     run(f, name, 64);
-                     run.Show(name);
-                 }),
-            CALL(TAVOLnxSetHostname, kInChild, { run(f, "tavo"); }),
-            CALL(TAVONetAddressProbe, kAnswers | kNoFaults, { run(f, "eth0", "192.0.2.2", 1); }),
-            CALL(TAVONetCheckpointEnd, kAnswers, { run(f); }),
-            CALL(TAVONetCheckpointPutBack, kAnswers, { run(f); }),
-            CALL(TAVONetCheckpointTake, kAnswers | kSteps, { run(f); }),
-            CALL(TAVONetDNSGet, 0,
-                 {
-                     Found found;
-                     run(f, &found.list);
-                     run.Show(found.list);
-                 }),
-            CALL(TAVONetDNSSet, 0,
-                 {
-                     TLIBSZLIST *servers = MakeList({"192.0.2.2"}).release();
-                     run(f, servers);
-                     TLIBSzListFree(servers);
-                 }),
-            CALL(TAVONetDefaultGatewayGet, 0,
-                 {
-                     char gateway[32] = "";
-                     run(f, gateway, 32);
-                     run.Show(gateway);
-                 }),
-            CALL(TAVONetDefaultGatewayGetConf, 0,
-                 {
-                     char gateway[32] = "";
-                     run(f, gateway, 32);
-                     run.Show(gateway);
-                 }),
-            CALL(TAVONetDefaultGatewaySet, 0, { run(f, "192.0.2.2"); }),
-            CALL(TAVONetDhcp6Wait, kAnswers | kNoFaults, { run(f, "eth0", 0); }),
-            CALL(TAVONetDhcpTest, 0, { run(f, "eth0", 1); }),
-            CALL(TAVONetHostsRefresh, kAnswers, { run(f); }),
-            CALL(TAVONetGetCard, kAnswers,
-                 {
-                     TAVONETCARD card = {};
-                     run(f, "eth0", &card);
-                 }),
-            CALL(TAVONetGetCard1, kAnswers,
-                 {
-                     TAVONETCARD card = {};
-                     run(f, &card);
-                 }),
-            CALL(TAVONetIPv6AddrAdd, 0, { run(f, "eth0", "2001:db8::1", 64); }),
-            CALL(TAVONetIPv6AddrDel, 0, { run(f, "eth0", "2001:db8::1", 64); }),
-            CALL(TAVONetIPv6AddrEnum, 0,
-                 {
-                     Found found;
-                     run(f, "eth0", &found.list);
-                     run.Show(found.list);
-                 }),
-            CALL(TAVONetIPv6RouteAdd, 0, { run(f, "eth0", "2001:db8:1::", 64, "fe80::1"); }),
-            CALL(TAVONetIPv6RouteDel, 0, { run(f, "eth0", "2001:db8:1::", 64, "fe80::1"); }),
-            CALL(TAVONetIPv6Set, kAnswers, { run(f, "eth0", 1); }),
-            CALL(TAVONetLinkAggrEnum, kAnswers,
-                 {
-                     Found found;
-                     run(f, &found.list);
-                 }),
-            CALL(TAVONetLinkAggrGet, kAnswers,
-                 {
-                     TAVONETLINKAGGR bond = {};
-                     run(f, "bond0", &bond);
-                 }),
-            CALL(TAVONetLinkAggrOptSlsaveAdd, 0,
-                 {
-                     TAVONETLINKAGGR bond = Bond();
-                     run(f, &bond, "eth1");
-                 }),
-            CALL(TAVONetLinkAggrPhyGet, kAnswers,
-                 {
-                     Found found;
-                     run(f, "bond0", &found.list);
-                 }),
-            CALL(TAVONetLinkAggrSet, kAnswers,
-                 {
-                     const TAVONETLINKAGGR bond = Bond();
-                     run(f, &bond);
-                 }),
-            CALL(TAVONetRouteAdd, 0, { run(f, "198.51.100.0", "255.255.255.0", "eth0"); }),
-            CALL(TAVONetRouteDel, 0, { run(f, "198.51.100.0", "255.255.255.0", "eth0"); }),
-            CALL(TAVONetSetCard1, kAnswers,
-                 {
-                     const TAVONETCARD card = Static();
-                     run(f, &card, static_cast<const TAVONETCARD *>(nullptr));
-                 }),
-            CALL(TAVONetSetMTUEth, 0, { run(f, "eth0", 1400); }),
-            CALL(TAVONetSetMTUValue, 0, { run(f, "eth0", 1400); }),
-            CALL(TAVONetWolGet, kAnswers, { run(f, "eth0"); }),
-            CALL(TAVONetWolSet, kAnswers, { run(f, "eth0", 1); }),
+            CALL(BlTAVOLnxIsDHCP, kAnswers, "eth0"),
+            CALL(BlTAVONetIPv6IsEnabled, kAnswers, "eth0"),
+            CALL(BlTLIBIsAtom, kZeroFails | kNoCode, "atom"),
+            CALL(BlTLIBIsConnected, kAnswers, "eth0"),
+            CALL(BlTLIBIsDomain, kZeroFails | kNoCode, "example.com"),
+            CALL(BlTLIBIsHostname, kZeroFails | kNoCode, "tavo"),
+            CALL(BlTLIBIsIpAddr, kZeroFails | kNoCode, "192.0.2.1"),
+            CALL(BlTLIBIsIpMask, kZeroFails | kNoCode, Text<16>{"255.255.255.0"}),
+            CALL(BlTLIBIsMailbox, kZeroFails | kNoCode, "a@example.com"),
+            CALL(BlTLIBIsPortInUse, kAnswers, 8080),
+            CALL(BlTLIBIsSubNet, kZeroFails | kNoCode, "192.0.2.0/255.255.255.0"),
+            CALL(BlTLIBIsWorkGroupName, kZeroFails | kNoCode, "WORKGROUP"),
+            CALL(BlTLIBIsv6IpAddrValid, kZeroFails | kNoCode, "fe80::1"),
+            CALL(ErrTLIBIpMaskToSubnet, 0, Text<64>{"192.0.2.1/255.255.255.0"}, Text<64>()),
+            CALL(ErrTLIBSubnetToIpMask, 0, Text<64>{"192.0.2.0/24"}, Text<64>()),
+            CALL(TAVOConfGetMTUValue, kAnswers, "eth0", Text<16>(), 16),
+            CALL(TAVOConfSetMTUValue, 0, "eth0", 1400),
+            CALL(TAVOGetMTUSetting, kAnswers, "eth0"),
+            CALL(TAVOIIpConflict, kAnswers, "eth0", "192.0.2.55"),
+            CALL(TAVOLnxGetHostname, 0, Text<64>(), 64),
+            CALL(TAVOLnxSetHostname, kInChild, "tavo"),
+            CALL(TAVONetAddressProbe, kAnswers | kNoFaults, "eth0", "192.0.2.2", 1),
+            CALL(TAVONetCheckpointEnd, kAnswers),
+            CALL(TAVONetCheckpointPutBack, kAnswers),
+            CALL(TAVONetCheckpointTake, kAnswers | kSteps),
+            CALL(TAVONetDNSGet, 0, ListOf({})),
+            CALL(TAVONetDNSSet, 0, ListOf({"192.0.2.2"})),
+            CALL(TAVONetDefaultGatewayGet, 0, Text<32>(), 32),
+            CALL(TAVONetDefaultGatewayGetConf, 0, Text<32>(), 32),
+            CALL(TAVONetDefaultGatewaySet, 0, "192.0.2.2"),
+            CALL(TAVONetDhcp6Wait, kAnswers | kNoFaults, "eth0", 0),
+            CALL(TAVONetDhcpTest, 0, "eth0", 1),
+            CALL(TAVONetHostsRefresh, kAnswers),
+            CALL(TAVONetGetCard, kAnswers, "eth0", Var<TAVONETCARD>()),
+            CALL(TAVONetGetCard1, kAnswers, Var<TAVONETCARD>()),
+            CALL(TAVONetIPv6AddrAdd, 0, "eth0", "2001:db8::1", 64),
+            CALL(TAVONetIPv6AddrDel, 0, "eth0", "2001:db8::1", 64),
+            CALL(TAVONetIPv6AddrEnum, 0, "eth0", ListOf({})),
+            CALL(TAVONetIPv6RouteAdd, 0, "eth0", "2001:db8:1::", 64, "fe80::1"),
+            CALL(TAVONetIPv6RouteDel, 0, "eth0", "2001:db8:1::", 64, "fe80::1"),
+            CALL(TAVONetIPv6Set, kAnswers, "eth0", 1),
+            CALL(TAVONetLinkAggrEnum, kAnswers, ListOf({})),
+            CALL(TAVONetLinkAggrGet, kAnswers, "bond0", Var<TAVONETLINKAGGR>()),
+            CALL(TAVONetLinkAggrOptSlsaveAdd, 0, Var<TAVONETLINKAGGR>{Bond()}, "eth1"),
+            CALL(TAVONetLinkAggrPhyGet, kAnswers, "bond0", ListOf({})),
+            CALL(TAVONetLinkAggrSet, kAnswers, Var<TAVONETLINKAGGR>{Bond()}),
+            CALL(TAVONetRouteAdd, 0, "198.51.100.0", "255.255.255.0", "eth0"),
+            CALL(TAVONetRouteDel, 0, "198.51.100.0", "255.255.255.0", "eth0"),
+            CALL(TAVONetSetCard1, kAnswers, Var<TAVONETCARD>{Static()}, nullptr),
+            CALL(TAVONetSetMTUEth, 0, "eth0", 1400),
+            CALL(TAVONetSetMTUValue, 0, "eth0", 1400),
+            CALL(TAVONetWolGet, kAnswers, "eth0"),
+            CALL(TAVONetWolSet, kAnswers, "eth0", 1),
 
             // Discovery.
-            CALL(ErrFHOSTSendBroadcastUdp, kAnswers, { run(f, static_cast<const void *>(stFHOSTHeader), 8); }),
-            CALL(ErrFHOSTSendQueryPkt, kAnswers, { run(f); }),
-            CALL(FHOSTBroadCastSize, 0, { run.Show(f); }),
-            CALL(FHOSTBroadCastSizeV11, 0, { run.Show(f); }),
-            CALL(FHOSTBroadCastSizeVDS20, 0, { run.Show(f); }),
-            CALL(FHOSTHeaderSize, 0, { run.Show(f); }),
-            CALL(TAVOFHOSTDumpHost, kAnswers, { run(f); }),
+            CALL(ErrFHOSTSendBroadcastUdp, kAnswers, static_cast<const void *>(stFHOSTHeader), 8),
+            CALL(ErrFHOSTSendQueryPkt, kAnswers),
+            BODY(FHOSTBroadCastSize, 0, { run.Show(f); }),
+            BODY(FHOSTBroadCastSizeV11, 0, { run.Show(f); }),
+            BODY(FHOSTBroadCastSizeVDS20, 0, { run.Show(f); }),
+            BODY(FHOSTHeaderSize, 0, { run.Show(f); }),
+            CALL(TAVOFHOSTDumpHost, kAnswers),
             // It watches for whole seconds.
-            CALL(TAVOFHOSTEnum, kAnswers | kNoFaults,
-                 {
-                     const TAVOFHOSTCALLBACK count = [](const TAVOFHOST *, void *) {
-                         return 0;
-                     };
-                     run(f, count, static_cast<void *>(nullptr), 1);
-                 }),
-            CALL(TAVOFHOSTGet2Hash, kAnswers,
-                 {
-                     TLIBSZHASH *hosts = PshTLIBSzHashAlloc(64);
-                     run(f, &hosts);
-                     TLIBSzHashFree(hosts);
-                 }),
-            CALL(stFHOSTBroadCast, 0, { run.Show(f[0]); }),
-            CALL(stFHOSTBroadCastV11, 0, { run.Show(f[0]); }),
-            CALL(stFHOSTBroadCastVDS20, 0, { run.Show(f[0]); }),
-            CALL(stFHOSTHeader, 0, { run.Show(f[0]); }),
+            CALL(
+                TAVOFHOSTEnum, kAnswers | kNoFaults, [](const TAVOFHOST *, void *) { return 0; }, nullptr, 1),
+            CALL(TAVOFHOSTGet2Hash, kAnswers, HashOf({})),
+            BODY(stFHOSTBroadCast, 0, { run.Show(f[0]); }),
+            BODY(stFHOSTBroadCastV11, 0, { run.Show(f[0]); }),
+            BODY(stFHOSTBroadCastVDS20, 0, { run.Show(f[0]); }),
+            BODY(stFHOSTHeader, 0, { run.Show(f[0]); }),
         },
         [] { return std::make_shared<Network>(); },
         {"/etc", "/usr/tavo/etc"},

@@ -1,8 +1,7 @@
 // Services: two volumes, the web service bound to the first, and a pid file that names this process as its daemon.
-#include "call.h"
+#include "arguments.h"
 #include "support/appliance_root.h"
 #include "support/captured_log.h"
-#include "support/container_text.h"
 #include "support/scratch_dir.h"
 
 #include <gtest/gtest.h>
@@ -17,8 +16,6 @@
 
 namespace every_call {
 namespace {
-
-using test::MakeList;
 
 constexpr const char *kVolumes[] = {"/volume1", "/volume2"};
 constexpr const char *kPackages = "/usr/tavo/etc/rc.d/packages";
@@ -59,15 +56,9 @@ const TAVOSERVICE *Row(const char *name)
     return TAVOServiceInfoGet(TAVOServiceIndexGet(name));
 }
 
-struct Found {
-    TLIBSZLIST *list = MakeList({}).release();
-
-    ~Found() { TLIBSzListFree(list); }
-};
-
 // An action handler, and a status handler.
-#define ACTION(name, row) CALL(name, kAnswers, { run(f, Row(row), int{TAVO_SERVICE_ENABLE}); })
-#define STATUS(name, row) CALL(name, kAnswers, { run(f, Row(row)); })
+#define ACTION(name, row) CALL(name, kAnswers, Row(row), int{TAVO_SERVICE_ENABLE})
+#define STATUS(name, row) CALL(name, kAnswers, Row(row))
 
 }  // namespace
 
@@ -76,98 +67,62 @@ Family ServiceFamily()
     return {
         "Services",
         {
-            CALL(TAVONetService, kAnswers, { run(f, TAVO_DAEMON_CRON | TAVO_DAEMON_MDNS, int{TAVO_DAEMON_START}); }),
+            CALL(TAVONetService, kAnswers, TAVO_DAEMON_CRON | TAVO_DAEMON_MDNS, int{TAVO_DAEMON_START}),
             ACTION(TAVOServiceAFP, "afp"),
             STATUS(TAVOServiceAFPStatus, "afp"),
-            CALL(TAVOServiceActionSet, kSteps, { run(f, 0, int{TAVO_SERVICE_ENABLE}); }),
+            CALL(TAVOServiceActionSet, kSteps, 0, int{TAVO_SERVICE_ENABLE}),
             ACTION(TAVOServiceAudio, "audio"),
-            CALL(TAVOServiceDaemonGet, 0, { run(f, "photo"); }),
-            CALL(TAVOServiceDaemonIDGet, 0, { run(f, 0); }),
-            CALL(TAVOServiceDataSearch, kAnswers,
-                 {
-                     char volume[52] = "";
-                     run(f, 1, volume, 52);
-                 }),
-            CALL(TAVOServiceDisableSet, 0, { run(f, 1); }),
-            CALL(TAVOServiceEnableGet, kAnswers, { run(f, 4); }),
+            CALL(TAVOServiceDaemonGet, 0, "photo"),
+            CALL(TAVOServiceDaemonIDGet, 0, 0),
+            CALL(TAVOServiceDataSearch, kAnswers, 1, Text<52>(), 52),
+            CALL(TAVOServiceDisableSet, 0, 1),
+            CALL(TAVOServiceEnableGet, kAnswers, 4),
             STATUS(TAVOServiceFTPStatus, "ftp"),
-            CALL(TAVOServiceGetAll, kAnswers,
-                 {
-                     Found found;
-                     run(f, &found.list);
-                 }),
-            CALL(TAVOServiceGetbyVolume, kAnswers,
-                 {
-                     Found found;
-                     run(f, kVolumes[0], &found.list);
-                 }),
+            CALL(TAVOServiceGetAll, kAnswers, ListOf({})),
+            CALL(TAVOServiceGetbyVolume, kAnswers, kVolumes[0], ListOf({})),
             ACTION(TAVOServiceHTTPS, "https"),
-            CALL(TAVOServiceIndexGet, 0, { run(f, "DB"); }),
-            CALL(TAVOServiceInfoGet, 0, { run(f, 0); }),
-            CALL(TAVOServiceIsOnVolume, kAnswers, { run(f, 1, kVolumes[0]); }),
-            CALL(TAVOServiceKeyGet, 0, { run(f, 0); }),
-            CALL(TAVOServiceLinkRemove, 0, { run(f, 1); }),
-            CALL(TAVOServiceLinkSet, 0, { run(f, 1, "/volume2/web"); }),
-            CALL(TAVOServiceNameGet, 0, { run(f, 0); }),
+            CALL(TAVOServiceIndexGet, 0, "DB"),
+            CALL(TAVOServiceInfoGet, 0, 0),
+            CALL(TAVOServiceIsOnVolume, kAnswers, 1, kVolumes[0]),
+            CALL(TAVOServiceKeyGet, 0, 0),
+            CALL(TAVOServiceLinkRemove, 0, 1),
+            CALL(TAVOServiceLinkSet, 0, 1, "/volume2/web"),
+            CALL(TAVOServiceNameGet, 0, 0),
             ACTION(TAVOServiceNetBkp, "netbkp"),
-            CALL(TAVOServiceNewVolumeDecide, kAnswers,
-                 {
-                     char volume[52] = "";
-                     run(f, 2, volume, 52);
-                 }),
-            CALL(TAVOServiceOnOffALL, kAnswers, { run(f, 0); }),
+            CALL(TAVOServiceNewVolumeDecide, kAnswers, 2, Text<52>(), 52),
+            CALL(TAVOServiceOnOffALL, kAnswers, 0),
             STATUS(TAVOServicePrinterStatus, "printer"),
-            CALL(TAVOServiceProcGet, 0, { run(f, 0); }),
-            CALL(TAVOServiceRemove, 0, { run(f, 1, 0); }),
-            CALL(TAVOServiceRemoveAll, kAnswers, { run(f, 0); }),
-            CALL(TAVOServiceRemovebyID, 0, { run(f, 0, 0); }),
-            CALL(TAVOServiceRemovebyInfo, 0, { run(f, Row("web"), 0); }),
-            CALL(TAVOServiceRemovebyVolume, kAnswers, { run(f, kVolumes[0], 0); }),
-            CALL(TAVOServiceRestartfromVolumeNone, kAnswers, { run(f); }),
-            CALL(TAVOServiceRestore, kAnswers, { run(f, kVolumes[0]); }),
+            CALL(TAVOServiceProcGet, 0, 0),
+            CALL(TAVOServiceRemove, 0, 1, 0),
+            CALL(TAVOServiceRemoveAll, kAnswers, 0),
+            CALL(TAVOServiceRemovebyID, 0, 0, 0),
+            CALL(TAVOServiceRemovebyInfo, 0, Row("web"), 0),
+            CALL(TAVOServiceRemovebyVolume, kAnswers, kVolumes[0], 0),
+            CALL(TAVOServiceRestartfromVolumeNone, kAnswers),
+            CALL(TAVOServiceRestore, kAnswers, kVolumes[0]),
             ACTION(TAVOServiceSAMBA, "samba"),
             ACTION(TAVOServiceSSH, "ssh"),
             STATUS(TAVOServiceSSHStatus, "ssh"),
-            CALL(TAVOServiceSTDAction, 0, { run(f, Row("photo"), int{TAVO_SERVICE_ENABLE}); }),
-            CALL(TAVOServiceSTDStatus, kAnswers, { run(f, Row("web")); }),
-            CALL(TAVOServiceScriptGet, 0, { run(f, 0); }),
-            CALL(TAVOServiceSet, 0, { run(f, 2, kVolumes[1]); }),
-            CALL(TAVOServiceSettingGet, kAnswers,
-                 {
-                     TAVOSERVICESHARE share = {};
-                     run(f, 1, &share);
-                 }),
-            CALL(TAVOServiceShareCreate, 0, { run(f, 2, kVolumes[1]); }),
-            CALL(TAVOServiceShareGen, 0,
-                 {
-                     char path[128] = "";
-                     run(f, 1, kVolumes[1], path, 128);
-                     run.Show(path);
-                 }),
-            CALL(TAVOServiceShareIDGet, 0, { run(f, 0); }),
-            CALL(TAVOServiceShareIsEmpty, 0, { run(f, 1); }),
-            CALL(TAVOServiceShareRemove, 0, { run(f, 1, 0); }),
-            CALL(TAVOServiceShareUpdate, 0, { run(f, 1, kVolumes[1]); }),
-            CALL(TAVOServiceStatusGet, kAnswers, { run(f, 0); }),
+            CALL(TAVOServiceSTDAction, 0, Row("photo"), int{TAVO_SERVICE_ENABLE}),
+            CALL(TAVOServiceSTDStatus, kAnswers, Row("web")),
+            CALL(TAVOServiceScriptGet, 0, 0),
+            CALL(TAVOServiceSet, 0, 2, kVolumes[1]),
+            CALL(TAVOServiceSettingGet, kAnswers, 1, Var<TAVOSERVICESHARE>()),
+            CALL(TAVOServiceShareCreate, 0, 2, kVolumes[1]),
+            CALL(TAVOServiceShareGen, 0, 1, kVolumes[1], Text<128>(), 128),
+            CALL(TAVOServiceShareIDGet, 0, 0),
+            CALL(TAVOServiceShareIsEmpty, 0, 1),
+            CALL(TAVOServiceShareRemove, 0, 1, 0),
+            CALL(TAVOServiceShareUpdate, 0, 1, kVolumes[1]),
+            CALL(TAVOServiceStatusGet, kAnswers, 0),
             ACTION(TAVOServiceTelnet, "telnet"),
             STATUS(TAVOServiceTelnetStatus, "telnet"),
-            CALL(TAVOServiceThirdPartyAll, kAnswers, { run(f, "start"); }),
-            CALL(TAVOServiceTypeGet, 0, { run(f, 0); }),
-            CALL(TAVOServiceUserHome, kAnswers | kHolds, { run(f, Row("userhome"), int{TAVO_SERVICE_ENABLE}); }),
-            CALL(TAVOServiceVolumeChange, 0, { run(f, 2, kVolumes[1]); }),
-            CALL(TAVOServiceVolumeGetbyLink, kAnswers,
-                 {
-                     char volume[52] = "";
-                     char path[52] = "";
-                     run(f, "/var/services/web", volume, 52, path, 52);
-                     run.Show(volume);
-                 }),
-            CALL(TAVOServiceVolumeGetbyShare, 0,
-                 {
-                     char volume[52] = "";
-                     run(f, "web", volume, 52);
-                     run.Show(volume);
-                 }),
+            CALL(TAVOServiceThirdPartyAll, kAnswers, "start"),
+            CALL(TAVOServiceTypeGet, 0, 0),
+            CALL(TAVOServiceUserHome, kAnswers | kHolds, Row("userhome"), int{TAVO_SERVICE_ENABLE}),
+            CALL(TAVOServiceVolumeChange, 0, 2, kVolumes[1]),
+            CALL(TAVOServiceVolumeGetbyLink, kAnswers, "/var/services/web", Text<52>(), 52, Text<52>(), 52),
+            CALL(TAVOServiceVolumeGetbyShare, 0, "web", Text<52>(), 52),
             ACTION(TAVOServiceiTunes, "itunes"),
             STATUS(TAVOServiceiTunesStatus, "itunes"),
         },

@@ -1,7 +1,6 @@
 // Disks, partitions, arrays and volume groups: two disks with a mirror and a volume group on it, as the kernel shows them.
-#include "call.h"
+#include "arguments.h"
 #include "support/captured_log.h"
-#include "support/container_text.h"
 #include "support/device_tree.h"
 #include "support/recorded_calls.h"
 #include "support/scratch_dir.h"
@@ -22,13 +21,19 @@
 namespace every_call {
 namespace {
 
-using test::MakeList;
-
 constexpr const char *kUuid = "495e879a:4e806313:a484c744:9c844bd2";
 
 // What the appliance's driver adds.
 constexpr unsigned long kArrayStatus = 0x80040961;
 constexpr unsigned long kSyncStatus = 0x80140960;
+
+mdu_array_info_t ArrayOfTwo()
+{
+    mdu_array_info_t info = {};
+    info.level = 1;
+    info.raid_disks = info.nr_disks = info.working_disks = 2;
+    return info;
+}
 
 // The kernel's answers. A real request is made for show, so that it can be failed like every other system call.
 int Answer(int, unsigned long request, void *argument)
@@ -39,9 +44,7 @@ int Answer(int, unsigned long request, void *argument)
         const uint64_t bytes = uint64_t{1} << 30;
         std::memcpy(argument, &bytes, sizeof bytes);
     } else if (request == GET_ARRAY_INFO) {
-        mdu_array_info_t info = {};
-        info.level = 1;
-        info.raid_disks = info.nr_disks = info.working_disks = 2;
+        const mdu_array_info_t info = ArrayOfTwo();
         std::memcpy(argument, &info, sizeof info);
     } else if (request == GET_DISK_INFO) {
         auto *disk = static_cast<mdu_disk_info_t *>(argument);
@@ -110,9 +113,10 @@ struct Storage {
 struct Mirror {
     RAIDMEMBER members[2] = {};
     RAIDINFO info = {};
-    TLIBSZLIST *paths = MakeList({"/dev/sda3", "/dev/sdb3"}).release();
+    RAIDLIST node = {&info, nullptr};
+    Owned<TLIBSZLIST> paths = ListOf({"/dev/sda3", "/dev/sdb3"});
 
-    Mirror()
+    explicit Mirror(int level = RAID_LEVEL_1)
     {
         std::strcpy(members[0].szPath, "/dev/sda3");
         std::strcpy(members[1].szPath, "/dev/sdb3");
@@ -120,15 +124,17 @@ struct Mirror {
         members[0].pNext = &members[1];
         info.nArray = 2;
         std::strcpy(info.szPath, "/dev/md2");
-        info.fLevel = RAID_LEVEL_1;
+        info.fLevel = level;
         info.nStatus = RAID_STATUS_NORMAL;
         info.cbArray = info.cbMember = uint64_t{96} << 20;
         info.nSlot = info.nWorking = 2;
         info.pMembers = members;
     }
-    ~Mirror() { TLIBSzListFree(paths); }
-    Mirror(const Mirror &) = delete;
-    Mirror &operator=(const Mirror &) = delete;
+
+    operator RAIDINFO *() { return &info; }
+    operator RAIDMEMBER *() { return members; }
+    operator RAIDLIST *() { return &node; }
+    operator TLIBSZLIST *() { return paths; }
 };
 
 struct OpenDevice {
@@ -136,8 +142,32 @@ struct OpenDevice {
     ~OpenDevice() { ::close(fd); }
     OpenDevice(const OpenDevice &) = delete;
     OpenDevice &operator=(const OpenDevice &) = delete;
+    operator int() const { return fd; }
     int fd;
 };
+
+struct VgInfo {
+    LVMVGINFO *info = LVMVgInfoAlloc();
+
+    explicit VgInfo(const char *pv = nullptr)
+    {
+        if (pv)
+            TLIBSzListPush(&info->pslPvs, pv);
+    }
+    ~VgInfo() { LVMVgInfoFree(info); }
+    VgInfo(const VgInfo &) = delete;
+    VgInfo &operator=(const VgInfo &) = delete;
+    operator LVMVGINFO *() { return info; }
+};
+
+// What a function makes: its last argument receives it.
+template <class T, class Function, class... Args>
+T *From(Function &function, Args... args)
+{
+    T *made = nullptr;
+    function(args..., &made);
+    return made;
+}
 
 LVMVG Group()
 {
@@ -155,495 +185,163 @@ Family StorageFamily()
         "Storage",
         {
             // Disks.
-            CALL(DiskContainerGet, 0,
-                 {
-                     int kind = 0;
-                     run(f, "/dev/sda", &kind);
-                     run.Show(kind);
-                 }),
-            CALL(DiskDDStatusGet, kAnswers,
-                 {
-                     uint64_t done = 0;
-                     uint64_t total = 0;
-                     run(f, "/dev/sda", &done, &total);
-                 }),
-            CALL(DiskInfoEnum, kAnswers,
-                 {
-                     DISKLIST *list = nullptr;
-                     run(f, static_cast<const int *>(nullptr), &list);
-                     DiskInfoEnumFree(list);
-                 }),
-            CALL(DiskInfoEnumFree, 0,
-                 {
-                     DISKLIST *list = nullptr;
-                     DiskInfoEnum(nullptr, &list);
-                     run(f, list);
-                 }),
-            CALL(DiskInfoFree, 0,
-                 {
-                     DISKINFO *info = nullptr;
-                     DiskInfoGet("/dev/sda", &info);
-                     run(f, info);
-                 }),
-            CALL(DiskInfoGet, kAnswers,
-                 {
-                     DISKINFO *info = nullptr;
-                     run(f, "/dev/sda", &info);
-                     DiskInfoFree(info);
-                 }),
-            CALL(DiskIsExist, kAnswers, { run(f, "/dev/sda"); }),
-            CALL(DiskListPush, 0,
-                 {
-                     DISKINFO info = {};
-                     DISKLIST *list = nullptr;
-                     run(f, &list, &info);
-                     std::free(list);
-                 }),
-            CALL(DiskPartitionsLayoutGet, kLeavesCode,
-                 {
-                     auto *layout = static_cast<TavoPartitionLayout *>(std::calloc(1, sizeof(TavoPartitionLayout)));
-                     run(f, "sda", layout);
-                     run.Show(layout->nEntry);
-                     std::free(layout);
-                 }),
-            CALL(DiskPartitionsLayoutInit, 0,
-                 {
-                     auto *layout = static_cast<TavoPartitionLayout *>(std::calloc(1, sizeof(TavoPartitionLayout)));
-                     run(f, layout);
-                     std::free(layout);
-                 }),
-            CALL(DiskPathParse, 0,
-                 {
-                     DISKPATH path = {};
-                     run(f, "/dev/sda3", &path);
-                     run.Show(path.nPartition);
-                 }),
-            CALL(DiskSizeGet, 0,
-                 {
-                     uint64_t sectors = 0;
-                     run(f, "/dev/sda", &sectors);
-                     run.Show(static_cast<long long>(sectors));
-                 }),
-            CALL(SmartDataRead, 0,
-                 {
-                     unsigned char page[512] = {};
-                     run(f, "/dev/sda", page, 0);
-                 }),
-            CALL(TAVODiskEnum, kAnswers,
-                 {
-                     int32_t *numbers = nullptr;
-                     run(f, int{DISK_ENUM_INTERNAL}, &numbers);
-                     std::free(numbers);
-                 }),
-            CALL(TAVODiskGetDevnameFromFd, kAnswers,
-                 {
-                     const OpenDevice device("/dev/sda");
-                     std::free(run(f, device.fd));
-                 }),
-            CALL(TAVODiskGetFileSBTimerSetting, kAnswers, { run(f); }),
-            CALL(TAVODiskGetInfo, 0,
-                 {
-                     TAVODISKINFO *info = nullptr;
-                     run(f, 1, 2048, &info);
-                     std::free(info);
-                 }),
-            CALL(TAVODiskGetStandbyTimer, kAnswers,
-                 {
-                     int minutes = 0;
-                     run(f, &minutes);
-                 }),
-            CALL(TAVODiskIsMvSocDriver, kAnswers, { run(f, "/dev/sda"); }),
-            CALL(TAVODiskIsSSD, kAnswers, { run(f, "/dev/sda"); }),
-            CALL(TAVODiskPartitionNumGet, 0,
-                 {
-                     char base[32] = "";
-                     run(f, "/dev/sda3", base, 32);
-                     run.Show(base);
-                 }),
-            CALL(TAVODiskSetFileSBTimerSetting, kLeavesCode, { run(f, 20); }),
-            CALL(TAVODiskSetStandby, kAnswers, { run(f); }),
-            CALL(TAVODiskSetStandbySeconds, kAnswers, { run(f, 600); }),
-            CALL(TAVODiskSetStandbyTimer, kAnswers, { run(f, 20); }),
-            CALL(TAVODiskTemperatureC, kAnswers, { run(f, "/dev/sda"); }),
-            CALL(TAVODiskTemperatureGet, 0, { run(f, "/dev/sda"); }),
-            CALL(TAVODiskUSBGetInfo, kAnswers,
-                 {
-                     uint64_t size = 0;
-                     run(f, "sda", &size);
-                 }),
-            CALL(TAVODiskWriteCacheGet, kAnswers, { run(f, "/dev/sda"); }),
-            CALL(TAVODiskWriteCacheSet, 0, { run(f, "/dev/sda", 1); }),
-            CALL(TAVOIDiskCheckPower, 0,
-                 {
-                     unsigned char state = 0;
-                     run(f, "/dev/sda", &state);
-                     run.Show(state);
-                 }),
-            CALL(TAVOIDiskEnterSleep, 0, { run(f, "/dev/sda"); }),
-            CALL(TAVOIDiskFlushBuffer, kNoCode, { run(f, "/dev/sda"); }),
-            CALL(TAVOIDiskRawOpen, 0,
-                 {
-                     const int fd = run(f, "/dev/sda");
-                     if (fd >= 0)
-                         ::close(fd);
-                 }),
-            CALL(TAVOIDiskReset, 0, { run(f, "/dev/sda"); }),
-            CALL(TAVOIDiskSetDiskStandby, 0, { run(f, "/dev/sda"); }),
-            CALL(TAVOIDiskSetDiskStandbyTimer, 0, { run(f, "/dev/sda", 120); }),
-            CALL(TAVOIsUSBDiskFATNoPartition, kAnswers, { run(f, "/dev/sdb"); }),
-            CALL(TAVOLnxDiskGetModel, 0,
-                 {
-                     char model[64] = "";
-                     run(f, "/dev/sda", model, 64);
-                     run.Show(model);
-                 }),
-            CALL(ata_command_interface, 0,
-                 {
-                     const OpenDevice device("/dev/sda");
-                     unsigned char data[512] = {};
-                     run(f, device.fd, int{DISK_COMMAND_CHECK_POWER}, data);
-                 }),
-            CALL(marvell_command_interface, kAnswers,
-                 {
-                     const OpenDevice device("/dev/sda");
-                     unsigned char data[512] = {};
-                     run(f, device.fd, int{DISK_COMMAND_CHECK_POWER}, data);
-                 }),
+            CALL(DiskContainerGet, 0, "/dev/sda", Var<int>()),
+            CALL(DiskDDStatusGet, kAnswers, "/dev/sda", Var<uint64_t>(), Var<uint64_t>()),
+            CALL(DiskInfoEnum, kAnswers, nullptr, Made<DiskInfoEnumFree>()),
+            CALL(DiskInfoEnumFree, 0, From<DISKLIST>(DiskInfoEnum, nullptr)),
+            CALL(DiskInfoFree, 0, From<DISKINFO>(DiskInfoGet, "/dev/sda")),
+            CALL(DiskInfoGet, kAnswers, "/dev/sda", Made<DiskInfoFree>()),
+            CALL(DiskIsExist, kAnswers, "/dev/sda"),
+            CALL(DiskListPush, 0, Made<std::free, DISKLIST *>(), Var<DISKINFO>()),
+            CALL(DiskPartitionsLayoutGet, kLeavesCode, "sda", Record<&TavoPartitionLayout::nEntry>()),
+            CALL(DiskPartitionsLayoutInit, 0, Record<&TavoPartitionLayout::nEntry>()),
+            CALL(DiskPathParse, 0, "/dev/sda3", Record<&DISKPATH::nPartition>()),
+            CALL(DiskSizeGet, 0, "/dev/sda", Var<uint64_t>()),
+            CALL(SmartDataRead, 0, "/dev/sda", Array<unsigned char, 512>(), 0),
+            CALL(TAVODiskEnum, kAnswers, int{DISK_ENUM_INTERNAL}, Made<std::free, int32_t *>()),
+            BODY(TAVODiskGetDevnameFromFd, kAnswers, { std::free(run(f, OpenDevice("/dev/sda"))); }),
+            CALL(TAVODiskGetFileSBTimerSetting, kAnswers),
+            CALL(TAVODiskGetInfo, 0, 1, 2048, Made<std::free, TAVODISKINFO *>()),
+            CALL(TAVODiskGetStandbyTimer, kAnswers, Var<int>()),
+            CALL(TAVODiskIsMvSocDriver, kAnswers, "/dev/sda"),
+            CALL(TAVODiskIsSSD, kAnswers, "/dev/sda"),
+            CALL(TAVODiskPartitionNumGet, 0, "/dev/sda3", Text<32>(), 32),
+            CALL(TAVODiskSetFileSBTimerSetting, kLeavesCode, 20),
+            CALL(TAVODiskSetStandby, kAnswers),
+            CALL(TAVODiskSetStandbySeconds, kAnswers, 600),
+            CALL(TAVODiskSetStandbyTimer, kAnswers, 20),
+            CALL(TAVODiskTemperatureC, kAnswers, "/dev/sda"),
+            CALL(TAVODiskTemperatureGet, 0, "/dev/sda"),
+            CALL(TAVODiskUSBGetInfo, kAnswers, "sda", Var<uint64_t>()),
+            CALL(TAVODiskWriteCacheGet, kAnswers, "/dev/sda"),
+            CALL(TAVODiskWriteCacheSet, 0, "/dev/sda", 1),
+            CALL(TAVOIDiskCheckPower, 0, "/dev/sda", Var<unsigned char>()),
+            CALL(TAVOIDiskEnterSleep, 0, "/dev/sda"),
+            CALL(TAVOIDiskFlushBuffer, kNoCode, "/dev/sda"),
+            BODY(TAVOIDiskRawOpen, 0, { ::close(run(f, "/dev/sda")); }),
+            CALL(TAVOIDiskReset, 0, "/dev/sda"),
+            CALL(TAVOIDiskSetDiskStandby, 0, "/dev/sda"),
+            CALL(TAVOIDiskSetDiskStandbyTimer, 0, "/dev/sda", 120),
+            CALL(TAVOIsUSBDiskFATNoPartition, kAnswers, "/dev/sdb"),
+            CALL(TAVOLnxDiskGetModel, 0, "/dev/sda", Text<64>(), 64),
+            CALL(ata_command_interface, 0, OpenDevice("/dev/sda"), int{DISK_COMMAND_CHECK_POWER},
+                 Array<unsigned char, 512>()),
+            CALL(marvell_command_interface, kAnswers, OpenDevice("/dev/sda"), int{DISK_COMMAND_CHECK_POWER},
+                 Array<unsigned char, 512>()),
 
             // Partitions.
-            CALL(BlTAVOCheckPartitionLayout, kAnswers,
-                 {
-                     int version = 0;
-                     run(f, "/dev/sda", 1, &version);
-                 }),
-            CALL(PartType, 0, { run.Show(f[1].nType); }),
-            CALL(PartitionAddTable, 0, { run(f, "/dev/sdb"); }),
-            CALL(PartitionClean, kAnswers, { run(f, "/dev/sda", int{PARTITION_DATA}); }),
-            CALL(PartitionCleanRAID, 0, { run(f, "/dev/sda", 3); }),
-            CALL(PartitionCreate, kAnswers,
-                 {
-                     const int version = 7;
-                     run(f, "/dev/sda", int{PARTITION_DATA}, &version);
-                 }),
-            CALL(PartitionIsExtended, kAnswers, { run(f, "/dev/sda1"); }),
-            CALL(PartitionLayoutGet, kAnswers,
-                 {
-                     int version = 0;
-                     run(f, &version);
-                 }),
-            CALL(PartitionPathEnum, 0,
-                 {
-                     TLIBSZLIST *list = MakeList({}).release();
-                     const PARTITIONFILTER filter = {"sda", 0};
-                     run(f, &filter, &list);
-                     run.Show(list);
-                     TLIBSzListFree(list);
-                 }),
-            CALL(PartitionTableTypeGet, 0,
-                 {
-                     int kind = 0;
-                     run(f, "/dev/sda", &kind);
-                     run.Show(kind);
-                 }),
-            CALL(RCPartitionConfigs, kAnswers,
-                 {
-                     int64_t start = 0;
-                     uint32_t type = 0;
-                     run(f, 1, "sda", &start, &type);
-                 }),
-            CALL(TAVOCheckSpecialDevice, kAnswers, { run(f, "/dev/sda"); }),
-            CALL(TAVOPartitionLayoutIdxGet, 0, { run(f, 7, 1); }),
-            CALL(grgAllTavoPartLayout, 0, { run.Show(f[0].nVersion); }),
+            CALL(BlTAVOCheckPartitionLayout, kAnswers, "/dev/sda", 1, Var<int>()),
+            BODY(PartType, 0, { run.Show(f[1].nType); }),
+            CALL(PartitionAddTable, 0, "/dev/sdb"),
+            CALL(PartitionClean, kAnswers, "/dev/sda", int{PARTITION_DATA}),
+            CALL(PartitionCleanRAID, 0, "/dev/sda", 3),
+            CALL(PartitionCreate, kAnswers, "/dev/sda", int{PARTITION_DATA}, Var<int>{7}),
+            CALL(PartitionIsExtended, kAnswers, "/dev/sda1"),
+            CALL(PartitionLayoutGet, kAnswers, Var<int>()),
+            CALL(PartitionPathEnum, 0, Var<PARTITIONFILTER>{{"sda", 0}}, ListOf({})),
+            CALL(PartitionTableTypeGet, 0, "/dev/sda", Var<int>()),
+            CALL(RCPartitionConfigs, kAnswers, 1, "sda", Var<int64_t>(), Var<uint32_t>()),
+            CALL(TAVOCheckSpecialDevice, kAnswers, "/dev/sda"),
+            CALL(TAVOPartitionLayoutIdxGet, 0, 7, 1),
+            BODY(grgAllTavoPartLayout, 0, { run.Show(f[0].nVersion); }),
 
             // Arrays.
-            CALL(RAIDAdd, 0,
+            CALL(RAIDAdd, 0, Mirror(), "/dev/sdb3"),
+            CALL(RAIDAddRobustCheck, kAnswers, Mirror(), "/dev/sdb3"),
+            CALL(RAIDAssemble, 0, "/dev/md2", kUuid),
+            CALL(RAIDAssembleByInfo, 0, Mirror()),
+            CALL(RAIDBadSectorRemap, kAnswers, "/dev/md2", 1),
+            BODY(RAIDCreate, kLeavesCode,
                  {
-                     const Mirror mirror;
-                     run(f, &mirror.info, "/dev/sdb3");
-                 }),
-            CALL(RAIDAddRobustCheck, kAnswers,
-                 {
-                     const Mirror mirror;
-                     run(f, &mirror.info, "/dev/sdb3");
-                 }),
-            CALL(RAIDAssemble, 0, { run(f, "/dev/md2", kUuid); }),
-            CALL(RAIDAssembleByInfo, 0,
-                 {
-                     const Mirror mirror;
-                     run(f, &mirror.info);
-                 }),
-            CALL(RAIDBadSectorRemap, kAnswers, { run(f, "/dev/md2", 1); }),
-            CALL(RAIDCreate, kLeavesCode,
-                 {
-                     const Mirror mirror;
+                     Mirror mirror;
                      RAIDREQUEST request = {};
                      request.szPath = "/dev/md2";
                      request.fLevel = RAID_LEVEL_1;
                      request.nSlot = 2;
-                     request.pslMembers = mirror.paths;
+                     request.pslMembers = mirror;
                      run(f, &request);
                  }),
-            CALL(RAIDDevCountChange, 0,
-                 {
-                     const Mirror mirror;
-                     run(f, &mirror.info, 3);
-                 }),
-            CALL(RAIDDiskCount, 0,
-                 {
-                     const Mirror mirror;
-                     run(f, mirror.members, int{RAID_MEMBER_ACTIVE});
-                 }),
-            CALL(RAIDDiskIsUsedByRAID, kAnswers,
-                 {
-                     int array = 0;
-                     run(f, "/dev/sda", &array);
-                 }),
-            CALL(RAIDExpansible, kAnswers,
-                 {
-                     const Mirror mirror;
-                     uint64_t size = 0;
-                     run(f, &mirror.info, &size);
-                 }),
-            CALL(RAIDInfoDup, 0,
-                 {
-                     const Mirror mirror;
-                     RAIDInfoFree(run(f, &mirror.info));
-                 }),
-            CALL(RAIDInfoEnum, kAnswers,
+            CALL(RAIDDevCountChange, 0, Mirror(), 3),
+            CALL(RAIDDiskCount, 0, Mirror(), int{RAID_MEMBER_ACTIVE}),
+            CALL(RAIDDiskIsUsedByRAID, kAnswers, "/dev/sda", Var<int>()),
+            CALL(RAIDExpansible, kAnswers, Mirror(), Var<uint64_t>()),
+            BODY(RAIDInfoDup, 0, { RAIDInfoFree(run(f, Mirror())); }),
+            CALL(RAIDInfoEnum, kAnswers, Made<RAIDListFree>()),
+            CALL(RAIDInfoFree, 0, RAIDInfoDup(Mirror())),
+            CALL(RAIDInfoGet, kAnswers, "/dev/md2", Made<RAIDInfoFree>()),
+            CALL(RAIDIoctlStatus, 0, OpenDevice("/dev/md2"), Var<int>()),
+            CALL(RAIDListCount, 0, Mirror()),
+            BODY(RAIDListFree, 0,
                  {
                      RAIDLIST *list = nullptr;
-                     run(f, &list);
-                     RAIDListFree(list);
-                 }),
-            CALL(RAIDInfoFree, 0,
-                 {
-                     const Mirror mirror;
-                     run(f, RAIDInfoDup(&mirror.info));
-                 }),
-            CALL(RAIDInfoGet, kAnswers,
-                 {
-                     RAIDINFO *info = nullptr;
-                     run(f, "/dev/md2", &info);
-                     RAIDInfoFree(info);
-                 }),
-            CALL(RAIDIoctlStatus, 0,
-                 {
-                     const OpenDevice device("/dev/md2");
-                     int status = 0;
-                     run(f, device.fd, &status);
-                     run.Show(status);
-                 }),
-            CALL(RAIDListCount, 0,
-                 {
-                     RAIDLIST node = {nullptr, nullptr};
-                     run(f, &node);
-                 }),
-            CALL(RAIDListFree, 0,
-                 {
-                     const Mirror mirror;
-                     RAIDLIST *list = nullptr;
-                     RAIDListPush(&list, RAIDInfoDup(&mirror.info));
+                     RAIDListPush(&list, RAIDInfoDup(Mirror()));
                      run(f, list);
                  }),
-            CALL(RAIDListPush, 0,
+            BODY(RAIDListPush, 0,
                  {
-                     const Mirror mirror;
-                     RAIDLIST *list = nullptr;
-                     RAIDINFO *copy = RAIDInfoDup(&mirror.info);
-                     if (run(f, &list, copy) < 0)
+                     RAIDINFO *copy = RAIDInfoDup(Mirror());
+                     if (run(f, Made<RAIDListFree>(), copy) < 0)
                          RAIDInfoFree(copy);
-                     RAIDListFree(list);
                  }),
-            CALL(RAIDListSearch, 0,
-                 {
-                     Mirror mirror;
-                     RAIDLIST node = {&mirror.info, nullptr};
-                     RAIDINFO *found = nullptr;
-                     run(f, &node, "/dev/md2", &found);
-                 }),
-            CALL(RAIDMdStripeSizeGet, kAnswers, { run(f, "/dev/md2"); }),
-            CALL(RAIDMigrate2RAID6, kAnswers,
-                 {
-                     Mirror mirror;
-                     mirror.info.fLevel = RAID_LEVEL_5;
-                     run(f, &mirror.info, mirror.paths);
-                 }),
-            CALL(RAIDParityDiskCount, 0, { run(f, int{RAID_LEVEL_5}, 4); }),
-            CALL(RAIDPathEnum, kAnswers,
-                 {
-                     TLIBSZLIST *list = MakeList({}).release();
-                     run(f, &list);
-                     run.Show(list);
-                     TLIBSzListFree(list);
-                 }),
-            CALL(RAIDRebuildStatusGet, 0,
-                 {
-                     const OpenDevice device("/dev/md2");
-                     RAIDPROGRESS progress = {};
-                     run(f, device.fd, &progress);
-                     run.Show(progress.nState);
-                 }),
-            CALL(RAIDRebuildingMultiWait, kAnswers,
-                 {
-                     TLIBSZLIST *list = MakeList({"/dev/md2"}).release();
-                     run(f, list);
-                     TLIBSzListFree(list);
-                 }),
-            CALL(RAIDRebuildingWait, kAnswers, { run(f, "/dev/md2"); }),
-            CALL(RAIDRemove, kLeavesCode,
-                 {
-                     const Mirror mirror;
-                     run(f, &mirror.info);
-                 }),
-            CALL(RAIDRemoveDisk, 0,
-                 {
-                     const Mirror mirror;
-                     run(f, &mirror.info, "/dev/sdb3");
-                 }),
-            CALL(RAIDRemoveMultiple, kAnswers,
-                 {
-                     TLIBSZLIST *list = MakeList({"/dev/md2"}).release();
-                     run(f, list);
-                     TLIBSzListFree(list);
-                 }),
-            CALL(RAIDReplaceDisk, kAnswers,
-                 {
-                     const Mirror mirror;
-                     run(f, &mirror.info, "/dev/sdb3", "/dev/sdc3");
-                 }),
-            CALL(RAIDSBClean, 0, { run(f, "/dev/sda3"); }),
-            CALL(RAIDSBCleanByUUID, kAnswers,
-                 {
-                     const Mirror mirror;
-                     run(f, &mirror.info, kUuid);
-                 }),
-            CALL(RAIDSBEnum, kAnswers,
-                 {
-                     const Mirror mirror;
-                     RAIDSBENTRY *entries = nullptr;
-                     run(f, mirror.paths, &entries);
-                     std::free(entries);
-                 }),
-            CALL(RAIDSBGet, kAnswers,
-                 {
-                     RAIDSUPERBLOCK superblock = {};
-                     run(f, "/dev/sda3", &superblock);
-                 }),
-            CALL(RAIDSizeUnallocGet, kLeavesCode,
-                 {
-                     const Mirror mirror;
-                     uint64_t size = 0;
-                     run(f, &mirror.info, &size);
-                 }),
-            CALL(RAIDStatusDecide, 0,
-                 {
-                     const Mirror mirror;
-                     mdu_array_info_t info = {};
-                     info.level = 1;
-                     info.raid_disks = info.nr_disks = info.working_disks = 2;
-                     int status = 0;
-                     run(f, &info, mirror.members, &status);
-                     run.Show(status);
-                 }),
-            CALL(RAIDStop, 0, { run(f, "/dev/md2"); }),
-            CALL(RAIDUUIDGet, kAnswers,
-                 {
-                     char uuid[64] = "";
-                     run(f, "/dev/md2", uuid, 64);
-                 }),
-            CALL(TAVORAIDMdStripeCacheSizeSet, 0, { run(f, "/dev/md2", 512); }),
-            CALL(TAVORAIDMdTuningPerformance, kAnswers, { run(f, "/dev/md2"); }),
+            CALL(RAIDListSearch, 0, Mirror(), "/dev/md2", Var<RAIDINFO *>()),
+            CALL(RAIDMdStripeSizeGet, kAnswers, "/dev/md2"),
+            CALL(RAIDMigrate2RAID6, kAnswers, Mirror(RAID_LEVEL_5), Mirror()),
+            CALL(RAIDParityDiskCount, 0, int{RAID_LEVEL_5}, 4),
+            CALL(RAIDPathEnum, kAnswers, ListOf({})),
+            CALL(RAIDRebuildStatusGet, 0, OpenDevice("/dev/md2"), Record<&RAIDPROGRESS::nState>()),
+            CALL(RAIDRebuildingMultiWait, kAnswers, ListOf({"/dev/md2"})),
+            CALL(RAIDRebuildingWait, kAnswers, "/dev/md2"),
+            CALL(RAIDRemove, kLeavesCode, Mirror()),
+            CALL(RAIDRemoveDisk, 0, Mirror(), "/dev/sdb3"),
+            CALL(RAIDRemoveMultiple, kAnswers, ListOf({"/dev/md2"})),
+            CALL(RAIDReplaceDisk, kAnswers, Mirror(), "/dev/sdb3", "/dev/sdc3"),
+            CALL(RAIDSBClean, 0, "/dev/sda3"),
+            CALL(RAIDSBCleanByUUID, kAnswers, Mirror(), kUuid),
+            CALL(RAIDSBEnum, kAnswers, Mirror(), Made<std::free, RAIDSBENTRY *>()),
+            CALL(RAIDSBGet, kAnswers, "/dev/sda3", Var<RAIDSUPERBLOCK>()),
+            CALL(RAIDSizeUnallocGet, kLeavesCode, Mirror(), Var<uint64_t>()),
+            CALL(RAIDStatusDecide, 0, Var<mdu_array_info_t>{ArrayOfTwo()}, Mirror(), Var<int>()),
+            CALL(RAIDStop, 0, "/dev/md2"),
+            CALL(RAIDUUIDGet, kAnswers, "/dev/md2", Text<64>(), 64),
+            CALL(TAVORAIDMdStripeCacheSizeSet, 0, "/dev/md2", 512),
+            CALL(TAVORAIDMdTuningPerformance, kAnswers, "/dev/md2"),
 
             // Volume groups.
-            CALL(LVMCleanIllegal, kAnswers, { run(f); }),
-            CALL(LVMCreate, kAnswers,
-                 {
-                     TLIBSZLIST *list = MakeList({"/dev/md2"}).release();
-                     char uuid[64] = "";
-                     run(f, list, "/dev/vg1", "lv", uuid, 64);
-                     TLIBSzListFree(list);
-                 }),
-            CALL(LVMGetLVPath, kAnswers,
-                 {
-                     char path[128] = "";
-                     run(f, "/dev/md2", path, 128);
-                 }),
-            CALL(LVMIsSupport, kAnswers, { run(f); }),
-            CALL(LVMLvCreate, 0, { run(f, "/dev/vg1", "lv"); }),
-            CALL(LVMPvCreate, 0, { run(f, "/dev/md2"); }),
-            CALL(LVMPvExpand, kAnswers,
-                 {
-                     LVMVGINFO *info = LVMVgInfoAlloc();
-                     TLIBSzListPush(&info->pslPvs, "/dev/md2");
-                     run(f, info);
-                     LVMVgInfoFree(info);
-                 }),
-            CALL(LVMPvParseLine, 0,
-                 {
-                     LVMPV pv = {};
-                     run(f, "  /dev/md2|vg1|lSQfeY-dso4-NzXN-Hbdv-wh1J-WThm-cNRXi7|1", &pv);
-                     run.Show(pv.szPv);
-                 }),
-            CALL(LVMPvRemove, 0, { run(f, "/dev/md2"); }),
-            CALL(LVMPvSBEnum, kAnswers,
-                 {
-                     LVMPVLIST *list = nullptr;
-                     run(f, &list);
-                     LVMPvSBListFree(list);
-                 }),
-            CALL(LVMPvSBGet, kAnswers,
-                 {
-                     LVMPV pv = {};
-                     run(f, "/dev/md2", &pv);
-                 }),
-            CALL(LVMPvSBListFree, 0,
+            CALL(LVMCleanIllegal, kAnswers),
+            CALL(LVMCreate, kAnswers, ListOf({"/dev/md2"}), "/dev/vg1", "lv", Text<64>(), 64),
+            CALL(LVMGetLVPath, kAnswers, "/dev/md2", Text<128>(), 128),
+            CALL(LVMIsSupport, kAnswers),
+            CALL(LVMLvCreate, 0, "/dev/vg1", "lv"),
+            CALL(LVMPvCreate, 0, "/dev/md2"),
+            CALL(LVMPvExpand, kAnswers, VgInfo("/dev/md2")),
+            CALL(LVMPvParseLine, 0, "  /dev/md2|vg1|lSQfeY-dso4-NzXN-Hbdv-wh1J-WThm-cNRXi7|1", Record<&LVMPV::szPv>()),
+            CALL(LVMPvRemove, 0, "/dev/md2"),
+            CALL(LVMPvSBEnum, kAnswers, Made<LVMPvSBListFree>()),
+            CALL(LVMPvSBGet, kAnswers, "/dev/md2", Var<LVMPV>()),
+            BODY(LVMPvSBListFree, 0,
                  {
                      const LVMPV pv = {};
                      LVMPVLIST *list = nullptr;
                      LVMPvSBListPush(&list, &pv);
                      run(f, list);
                  }),
-            CALL(LVMPvSBListPush, 0,
+            CALL(LVMPvSBListPush, 0, Made<LVMPvSBListFree>(), Var<LVMPV>()),
+            CALL(LVMPvScan, 0),
+            CALL(LVMRemove, kAnswers, "/dev/vg1", "vg"),
+            CALL(LVMRemoveLV, kAnswers, "/dev/md2"),
+            CALL(LVMVgCreate, 0, "/dev/vg1", ListOf({"/dev/md2"})),
+            BODY(LVMVgInfoAlloc, 0, { LVMVgInfoFree(run(f)); }),
+            CALL(LVMVgInfoFree, 0, LVMVgInfoAlloc()),
+            CALL(LVMVgRemove, 0, "/dev/vg1"),
+            CALL(LVMVgRename, 0, "/dev/vg1", "vg1", "vg2"),
+            CALL(LVMVgSB2Info, kAnswers, Var<LVMVG>{Group()}, VgInfo()),
+            CALL(LVMVgSBGet, kAnswers, "/dev/vg1", Var<LVMVG>()),
+            BODY(LVMVgSBListSearch, 0,
                  {
-                     const LVMPV pv = {};
-                     LVMPVLIST *list = nullptr;
-                     run(f, &list, &pv);
-                     LVMPvSBListFree(list);
-                 }),
-            CALL(LVMPvScan, 0, { run(f); }),
-            CALL(LVMRemove, kAnswers, { run(f, "/dev/vg1", "vg"); }),
-            CALL(LVMRemoveLV, kAnswers, { run(f, "/dev/md2"); }),
-            CALL(LVMVgCreate, 0,
-                 {
-                     TLIBSZLIST *list = MakeList({"/dev/md2"}).release();
-                     run(f, "/dev/vg1", list);
-                     TLIBSzListFree(list);
-                 }),
-            CALL(LVMVgInfoAlloc, 0, { LVMVgInfoFree(run(f)); }),
-            CALL(LVMVgInfoFree, 0, { run(f, LVMVgInfoAlloc()); }),
-            CALL(LVMVgRemove, 0, { run(f, "/dev/vg1"); }),
-            CALL(LVMVgRename, 0, { run(f, "/dev/vg1", "vg1", "vg2"); }),
-            CALL(LVMVgSB2Info, kAnswers,
-                 {
-                     const LVMVG group = Group();
-                     LVMVGINFO *info = LVMVgInfoAlloc();
-                     run(f, &group, info);
-                     LVMVgInfoFree(info);
-                 }),
-            CALL(LVMVgSBGet, kAnswers,
-                 {
-                     LVMVG group = {};
-                     run(f, "/dev/vg1", &group);
-                 }),
-            CALL(LVMVgSBListSearch, 0,
-                 {
-                     LVMVGINFO *info = LVMVgInfoAlloc();
-                     std::strcpy(info->szVg, "/dev/vg1");
+                     VgInfo info;
+                     std::strcpy(info.info->szVg, "/dev/vg1");
                      const LVMVGLIST node = {info, nullptr};
-                     const LVMVGKEY key = {"/dev/vg1", nullptr};
-                     LVMVGINFO *found = nullptr;
-                     run(f, &node, &key, &found);
-                     LVMVgInfoFree(info);
+                     run(f, &node, Var<LVMVGKEY>{{"/dev/vg1", nullptr}}, Var<LVMVGINFO *>());
                  }),
         },
         [] { return std::make_shared<Storage>(); },
