@@ -4,6 +4,7 @@
 #include "tavo_error.h"
 
 #include "account/detail/colon_fields.h"
+#include "core/detail/text_fields.h"
 
 namespace tavo {
 
@@ -19,11 +20,8 @@ int ParseGroupLine(std::string_view text, GroupLine &line)
         return ERR_FORMAT_ERROR;
     line = {std::string(fields[0]), *gid, {}};
     for (std::string_view rest = fields[3]; !rest.empty();) {
-        const size_t comma = rest.find(',');
-        const std::string_view member = rest.substr(0, comma);
-        if (IsMember(member))
+        if (const std::string_view member = TakeUntil(rest, ','); IsMember(member))
             line.members.emplace_back(member);
-        rest.remove_prefix(comma == rest.npos ? rest.size() : comma + 1);
     }
     return 0;
 }

@@ -2,6 +2,7 @@
 #include "account/detail/store_seal.h"
 
 #include "account/detail/free_name.h"
+#include "core/detail/appliance_paths.h"
 #include "core/detail/open_file.h"
 #include "core/detail/temp_file.h"
 
@@ -25,7 +26,7 @@ std::string ReadSmall(const Fd &fd)
 // Stores are not synced to disk, so those that a crash of the machine left behind are not to be trusted.
 std::string RunOfTheMachine()
 {
-    return ReadSmall(OpenFd("/proc/sys/kernel/random/boot_id", O_RDONLY));
+    return ReadSmall(OpenFd(kBootId, O_RDONLY));
 }
 
 // Appends a line that changes with every change of the file. Returns false for anything but a regular file.

@@ -7,6 +7,7 @@
 #include "account/detail/group_owner.h"
 #include "account/detail/user_enumeration.h"
 #include "core/detail/guard.h"
+#include "core/detail/text_fields.h"
 
 #include <optional>
 
@@ -32,11 +33,8 @@ extern "C" int TAVOGroupListMember(const char *szName, TLIBSZLIST **ppList)
         if (length < 0)
             return Fail(tavoerrno);
         std::vector<std::string> names;
-        for (std::string_view rest(valid.data(), static_cast<size_t>(length) - 1); !rest.empty();) {
-            const size_t comma = rest.find(',');
-            names.emplace_back(rest.substr(0, comma));
-            rest.remove_prefix(comma == rest.npos ? rest.size() : comma + 1);
-        }
+        for (std::string_view rest(valid.data(), static_cast<size_t>(length) - 1); !rest.empty();)
+            names.emplace_back(tavo::TakeUntil(rest, ','));
         return tavo::PushNames(ppList, names) ? static_cast<int>(names.size()) : Fail(ERR_OUT_OF_MEMORY);
     });
 }

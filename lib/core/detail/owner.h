@@ -91,6 +91,16 @@ class File {
     std::FILE *stream_ = nullptr;
 };
 
+// For std::unique_ptr: releases a record by the function of its family, such as FreedBy<RAIDInfoFree>.
+template <auto release>
+struct FreedBy {
+    template <class Record>
+    void operator()(Record *record) const
+    {
+        release(record);
+    }
+};
+
 // A block from malloc, for a caller that releases it with free.
 template <class T>
 class HeapBlock {

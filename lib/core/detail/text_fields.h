@@ -1,4 +1,4 @@
-// Lines and blank-separated fields of kernel files and tool outputs.
+// Lines and fields of settings files, kernel files and tool outputs.
 #ifndef TAVO_CORE_DETAIL_TEXT_FIELDS_H
 #define TAVO_CORE_DETAIL_TEXT_FIELDS_H
 
@@ -7,13 +7,18 @@
 
 namespace tavo {
 
-// Takes the first line, without its newline, off the text.
+// Takes what comes before the first separator off the text, and the separator.
+inline std::string_view TakeUntil(std::string_view &text, char separator)
+{
+    const size_t end = text.find(separator);
+    const std::string_view part = text.substr(0, end);
+    text.remove_prefix(end == std::string_view::npos ? text.size() : end + 1);
+    return part;
+}
+
 inline std::string_view TakeLine(std::string_view &text)
 {
-    const size_t newline = text.find('\n');
-    const std::string_view line = text.substr(0, newline);
-    text.remove_prefix(newline == std::string_view::npos ? text.size() : newline + 1);
-    return line;
+    return TakeUntil(text, '\n');
 }
 
 // The text without the bytes of `blanks` at both ends.

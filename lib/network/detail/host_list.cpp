@@ -1,6 +1,7 @@
 // One line of the list of discovered hosts.
 #include "network/detail/host_list.h"
 
+#include "core/detail/text_fields.h"
 #include "network/detail/ipv4_text.h"
 #include "network/detail/net_buffer.h"
 
@@ -28,11 +29,9 @@ using Fields = std::array<std::string_view, kFields>;
 bool Split(std::string_view line, Fields &field) noexcept
 {
     for (size_t i = 0; i < kFields; ++i) {
-        const size_t comma = line.find(',');
-        field[i] = line.substr(0, comma);
-        if (comma == std::string_view::npos && i + 1 < kFields)
+        if (i + 1 < kFields && line.find(',') == line.npos)
             return false;
-        line.remove_prefix(comma == std::string_view::npos ? line.size() : comma + 1);
+        field[i] = TakeUntil(line, ',');
     }
     return true;
 }

@@ -11,6 +11,7 @@ namespace tavo {
 
 inline constexpr const char *kInterfaceFolder = "/etc/sysconfig/network-scripts/";
 inline constexpr const char *kNetworkFile = "/etc/sysconfig/network";  // GATEWAY, HOSTNAME
+inline constexpr const char *kResolverFile = "/etc/resolv.conf";       // name servers; the DHCP client writes it, too
 
 // The name must have passed IsInterfaceName.
 std::string InterfaceFile(std::string_view interface);

@@ -95,7 +95,7 @@ bool AddAll(Checkpoint &all)
     if (!interfaces)
         return false;
     all.Add({UndoStep::structure, {}, StructureText(*interfaces), {}});
-    for (const char *path : {kNetworkFile, "/etc/resolv.conf", "/etc/hosts"}) {
+    for (const char *path : {kNetworkFile, kResolverFile, "/etc/hosts"}) {
         if (!all.AddFile(path))
             return false;
     }

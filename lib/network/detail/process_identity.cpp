@@ -1,6 +1,7 @@
 // A process that is still the same one.
 #include "network/detail/process_identity.h"
 
+#include "core/detail/appliance_paths.h"
 #include "core/detail/process_list.h"
 #include "core/detail/text_fields.h"
 #include "network/detail/kernel_interface.h"
@@ -59,7 +60,7 @@ pid_t ToPid(std::string_view text)
 
 std::string BootId()
 {
-    return ReadKernelFile("/proc/sys/kernel/random/boot_id").value_or("unknown\n");
+    return ReadKernelFile(kBootId).value_or("unknown\n");
 }
 
 }  // namespace tavo

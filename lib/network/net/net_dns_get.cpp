@@ -3,6 +3,7 @@
 
 #include "core/detail/guard.h"
 #include "core/detail/text_fields.h"
+#include "network/detail/interface_file.h"
 #include "network/detail/kernel_interface.h"
 
 #include <string>
@@ -12,7 +13,7 @@ extern "C" int TAVONetDNSGet(TLIBSZLIST **ppServers)
     if (!ppServers || !*ppServers)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        const auto text = tavo::ReadKernelFile("/etc/resolv.conf");
+        const auto text = tavo::ReadKernelFile(tavo::kResolverFile);
         if (!text)
             return Fail(ERR_OPEN_FAILED);
         int count = 0;

@@ -5,6 +5,7 @@
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "network/detail/checkpoint.h"
+#include "network/detail/interface_file.h"
 #include "network/detail/ipv4_text.h"
 #include "network/detail/network_change.h"
 
@@ -15,8 +16,6 @@
 #include <arpa/inet.h>
 
 namespace {
-
-constexpr const char *kResolver = "/etc/resolv.conf";
 
 // The address as the resolver reads it ("010" is 8); empty for other text.
 std::string ServerText(const char *text)
@@ -31,7 +30,8 @@ std::string ServerText(const char *text)
 void LogFailure(int code)
 {
     if (code == ERR_RENAME_FAILED)
-        LogError("%s (%d) rename(%s, %s) failed.(%s)", "/etc/resolv.conf.tmp", kResolver, std::strerror(errno));
+        LogError("%s (%d) rename(%s, %s) failed.(%s)", "/etc/resolv.conf.tmp", tavo::kResolverFile,
+                 std::strerror(errno));
     else if (code == ERR_WRITE_FAILED)
         LogError("%s (%d) fflush failed.(%s)", std::strerror(errno));
 }
@@ -39,10 +39,10 @@ void LogFailure(int code)
 int Write(const std::string &text)
 {
     tavo::Checkpoint before;
-    before.AddFile(kResolver);
+    before.AddFile(tavo::kResolverFile);
     before.Begin();
     tavo::FileRewrite rewrite;
-    int code = rewrite.Open(kResolver);
+    int code = rewrite.Open(tavo::kResolverFile);
     if (code == 0 || rewrite.IsMissing())
         code = rewrite.Replace(text, 0644);
     const int error = errno;

@@ -117,7 +117,7 @@ int SetCard(const TAVONETCARD &card, const TAVONETCARD *previous)
     const bool dhcp = card.nMode == TAVO_NET_DHCP;
     tavo::Checkpoint before;
     before.AddFile(tavo::InterfaceFile(card.szInterface));
-    before.AddFile("/etc/resolv.conf");  // the client may write it
+    before.AddFile(tavo::kResolverFile);
     before.AddCard(card.szInterface);
     before.Begin();
     const tavo::FurtherAddresses further(card.szInterface);

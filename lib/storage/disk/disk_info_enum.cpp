@@ -13,10 +13,6 @@
 
 namespace {
 
-struct FreeList {
-    void operator()(DISKLIST *list) const { DiskInfoEnumFree(list); }
-};
-
 class Gathered {
   public:
     // Returns false when memory ran out. An empty bay or slot is not a failure, and neither is a disk that cannot be
@@ -44,7 +40,7 @@ class Gathered {
     DISKLIST *Release() { return list_.release(); }
 
   private:
-    std::unique_ptr<DISKLIST, FreeList> list_;
+    std::unique_ptr<DISKLIST, tavo::FreedBy<DiskInfoEnumFree>> list_;
     int count_ = 0;
 };
 

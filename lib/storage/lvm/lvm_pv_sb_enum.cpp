@@ -4,16 +4,13 @@
 #include "core/detail/command_output.h"
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
+#include "core/detail/owner.h"
 
 #include <memory>
 
 namespace {
 
-struct FreeList {
-    void operator()(LVMPVLIST *list) const { LVMPvSBListFree(list); }
-};
-
-bool Add(const LVMPV &pv, std::unique_ptr<LVMPVLIST, FreeList> &owner)
+bool Add(const LVMPV &pv, std::unique_ptr<LVMPVLIST, tavo::FreedBy<LVMPvSBListFree>> &owner)
 {
     LVMPVLIST *list = owner.release();
     const bool pushed = LVMPvSBListPush(&list, &pv) == 0;
@@ -36,7 +33,7 @@ extern "C" int LVMPvSBEnum(LVMPVLIST **ppList)
         const std::string command =
             "/sbin/pvs --noheading -o pv_name,vg_name,vg_uuid,pv_count --separator \"|\" 2>/dev/null";
         tavo::CommandOutput output(command);
-        std::unique_ptr<LVMPVLIST, FreeList> list;
+        std::unique_ptr<LVMPVLIST, tavo::FreedBy<LVMPvSBListFree>> list;
         int count = 0;
         LVMPV pv;
         for (std::string line; output.Next(line);) {

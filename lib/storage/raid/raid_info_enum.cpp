@@ -4,14 +4,11 @@
 #include "core/detail/guard.h"
 #include "core/detail/list_owner.h"
 #include "core/detail/log.h"
+#include "core/detail/owner.h"
 
 #include <memory>
 
 namespace {
-
-struct FreeList {
-    void operator()(RAIDLIST *list) const { RAIDListFree(list); }
-};
 
 // An array may go between its listing and its reading.
 bool IsGone(int code)
@@ -20,7 +17,7 @@ bool IsGone(int code)
 }
 
 // Returns 1 when added, 0 when skipped, or -1.
-int Add(const char *path, std::unique_ptr<RAIDLIST, FreeList> &owner)
+int Add(const char *path, std::unique_ptr<RAIDLIST, tavo::FreedBy<RAIDListFree>> &owner)
 {
     RAIDINFO *info = nullptr;
     const int result = RAIDInfoGet(path, &info);
@@ -51,7 +48,7 @@ extern "C" int RAIDInfoEnum(RAIDLIST **ppList)
         tavo::ListOwner paths(PslTLIBSzListAlloc(512));
         if (!paths || RAIDPathEnum(paths.Addr()) < 0)
             return -1;
-        std::unique_ptr<RAIDLIST, FreeList> list;
+        std::unique_ptr<RAIDLIST, tavo::FreedBy<RAIDListFree>> list;
         int count = 0;
         for (int i = 0; i < paths->nItem; ++i) {
             const int added = Add(paths->pszItem[i], list);

@@ -4,6 +4,7 @@
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "core/detail/open_file.h"
+#include "core/detail/owner.h"
 #include "storage/detail/array_level.h"
 #include "storage/detail/array_members.h"
 #include "storage/detail/array_name.h"
@@ -15,10 +16,6 @@
 #include <memory>
 
 namespace {
-
-struct FreeInfo {
-    void operator()(RAIDINFO *info) const { RAIDInfoFree(info); }
-};
 
 bool IsAbsent(int error)
 {
@@ -73,7 +70,8 @@ extern "C" int RAIDInfoGet(const char *szPath, RAIDINFO **ppInfo)
             LogError("%s:%d unknown raid level: %d", array.level);
             return Fail(ERR_UNKNOWN);
         }
-        std::unique_ptr<RAIDINFO, FreeInfo> owner(static_cast<RAIDINFO *>(std::calloc(1, sizeof(RAIDINFO))));
+        std::unique_ptr<RAIDINFO, tavo::FreedBy<RAIDInfoFree>> owner(
+            static_cast<RAIDINFO *>(std::calloc(1, sizeof(RAIDINFO))));
         if (!owner)
             return Fail(ERR_OUT_OF_MEMORY);
         RAIDINFO &info = *owner;
