@@ -24,7 +24,8 @@ int CloseBtree(void *store) noexcept;
 void SyncBy(int (*sync)(int fd)) noexcept;
 
 // While one of these lives, the database opens, closes and allocates through us: without memory for its environment it
-// would crash, a file that cannot be closed it closes twice, and one that cannot be set up it leaves open.
+// would crash, a file that cannot be closed it closes twice, one that cannot be set up it leaves open, and it writes what
+// went wrong to the program's standard error.
 class DatabaseCall {
   public:
     DatabaseCall() noexcept;

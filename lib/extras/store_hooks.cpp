@@ -12,6 +12,7 @@
 
 #include <db.h>
 #include <fcntl.h>
+#include <pthread.h>
 #include <unistd.h>
 
 namespace tavo::extras {
@@ -22,17 +23,26 @@ namespace {
 constexpr size_t kPieceOfEnvironment = 8 << 10;
 static_assert(sizeof(DB_ENV) <= kPieceOfEnvironment);
 
-// The thread whose calls are replaced; 0 when there is none. The hooks are global in the program, and a lock would stay
+// The thread whose calls are replaced; 0 when there is none: pthread_self() costs no system call. The hooks are global in the program, and a lock would stay
 // locked in a child of it; so of two threads at once, the second one's calls are not replaced.
-constinit std::atomic<pid_t> owner = 0;
+constinit std::atomic<pthread_t> owner = 0;
 
 constinit void *spares[2] = {nullptr, nullptr};
 constinit int opened[8] = {-1, -1, -1, -1, -1, -1, -1, -1};
 constinit int close_error = 0;
 
+// The environment of an open that has begun, until its messages have somewhere to go.
+constinit DB_ENV *environment = nullptr;
+constinit bool is_awaited = false;
+
+// The library's caller learns of a failure by its code and the system log; his standard error is not ours.
+void DropMessage(const DB_ENV *, const char *, const char *) noexcept
+{
+}
+
 bool IsOwner() noexcept
 {
-    return owner == ::gettid();
+    return owner == ::pthread_self();
 }
 
 void Exchange(int from, int to) noexcept
@@ -43,11 +53,15 @@ void Exchange(int from, int to) noexcept
 
 void *AllocateOrSpare(size_t size) noexcept
 {
+    if (IsOwner() && environment)  // it has been set to zero since
+        std::exchange(environment, nullptr)->db_errcall = DropMessage;
     void *block = std::malloc(size);
     if (!block && IsOwner() && size <= kPieceOfEnvironment)
         for (void *&spare : spares)
             if (!block)
                 std::swap(block, spare);
+    if (IsOwner() && std::exchange(is_awaited, false) && size == sizeof(DB_ENV))
+        environment = static_cast<DB_ENV *>(block);
     return block;
 }
 
@@ -84,12 +98,14 @@ void SyncBy(int (*sync)(int fd)) noexcept
 
 DatabaseCall::DatabaseCall() noexcept
 {
-    pid_t none = 0;
-    is_owner_ = owner.compare_exchange_strong(none, ::gettid());
+    pthread_t none = 0;
+    is_owner_ = owner.compare_exchange_strong(none, ::pthread_self());
     if (!is_owner_)
         return;
     std::fill(std::begin(opened), std::end(opened), -1);
     close_error = 0;
+    environment = nullptr;
+    is_awaited = false;
     ::db_env_set_func_malloc(AllocateOrSpare);
     ::db_env_set_func_open(OpenNoted);
     ::db_env_set_func_close(CloseOnce);
@@ -115,6 +131,7 @@ bool DatabaseCall::Reserve() noexcept
         for (void *&spare : spares)
             if (!spare && !(spare = std::malloc(kPieceOfEnvironment)))
                 return false;
+    is_awaited = is_owner_;
     return true;
 }
 

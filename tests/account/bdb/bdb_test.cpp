@@ -8,6 +8,7 @@
 #include <gtest/gtest.h>
 
 #include <chrono>
+#include <csignal>
 #include <cstring>
 #include <ctime>
 #include <functional>
@@ -16,6 +17,7 @@
 #include <vector>
 
 #include <fcntl.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -287,6 +289,29 @@ TEST(Bdb, LeftoversOfACreationDoNotMatter)
     struct stat st;
     ASSERT_EQ(::stat((dir / "store").c_str(), &st), 0);
     EXPECT_EQ(st.st_mode & 07777, 0666u);
+}
+
+// The database would say so on the standard error of whichever program called.
+TEST(Bdb, AFailingWriteIsSaidByTheCodeOnly)
+{
+    const test::ScratchDir dir;
+    struct rlimit before;
+    ASSERT_EQ(::getrlimit(RLIMIT_FSIZE, &before), 0);
+    const auto signalled = std::signal(SIGXFSZ, SIG_IGN);
+    TAVOBDB *const store = TAVOBDbOpen((dir / "store").c_str(), O_RDWR | O_CREAT, 1);
+    ASSERT_NE(store, nullptr);
+    const struct rlimit small = {64 << 10, before.rlim_max};
+    ::setrlimit(RLIMIT_FSIZE, &small);
+    testing::internal::CaptureStderr();
+    const std::string value(4000, 'x');
+    bool failed = false;
+    for (int key = 0; key < 40; ++key)  // less than the database keeps in memory, so that closing writes it
+        failed |= TAVOBDbSet(store, &key, sizeof key, value.data(), int(value.size())) != 0;
+    failed |= TAVOBDbClose(store) != 0;
+    ::setrlimit(RLIMIT_FSIZE, &before);
+    std::signal(SIGXFSZ, signalled);
+    EXPECT_TRUE(failed);
+    EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
 }
 
 // After the first failure the handle is still good, and nothing leaks.
