@@ -17,6 +17,7 @@
 #include <cstring>
 #include <functional>
 #include <set>
+#include <string_view>
 
 #include <fcntl.h>
 #include <sys/mman.h>
@@ -257,6 +258,13 @@ bool Long()
     return std::getenv("TAVO_LONG_TESTS") != nullptr;
 }
 
+// One call alone, for whoever looks into its faults.
+bool IsAsked(const Call &call)
+{
+    const char *only = std::getenv("TAVO_CALL");
+    return !only || std::string_view(only) == call.name;
+}
+
 // Which of the faults a short run takes: others with another seed, the same ones with the same.
 class Sample {
   public:
@@ -395,6 +403,8 @@ TEST_F(Faults, EveryAllocation)
 {
     const test::CapturedLog silence;
     for (const Call &call : kCalls) {
+        if (!IsAsked(call))
+            continue;
         SCOPED_TRACE(call.name);
         ASSERT_NO_FATAL_FAILURE(Undisturbed(call));
         for (const bool ready : {true, false}) {
@@ -456,6 +466,8 @@ TEST_F(Faults, EverySystemCall)
         GTEST_SKIP() << "no ptrace here";
     constexpr int kErrors[] = {EIO, ENOSPC, EACCES, EMFILE, EINTR};
     for (const Call &call : kCalls) {
+        if (!IsAsked(call))
+            continue;
         SCOPED_TRACE(call.name);
         ASSERT_NO_FATAL_FAILURE(Undisturbed(call));
         for (const bool ready : {true, false}) {
