@@ -1,0 +1,340 @@
+// What a caller gets wrong: each argument in turn is the null pointer or one of its bad values while the others are good.
+// The call is refused with its code under its own name, before it looks at the appliance.
+#include "tavosdk.h"
+
+#include "support/fault_state.h"
+
+#include <gtest/gtest.h>
+
+#include <concepts>
+#include <cstring>
+#include <tuple>
+#include <type_traits>
+#include <utility>
+#include <vector>
+
+namespace {
+
+struct MayBeNull {};
+
+// A good value, and bad ones.
+template <typename T>
+struct Argument {
+    Argument(T value, std::convertible_to<T> auto... others) : Argument(MayBeNull(), value, others...)
+    {
+        if constexpr (std::is_pointer_v<T>)
+            bad.push_back(nullptr);
+    }
+    Argument(MayBeNull, T value, std::convertible_to<T> auto... others) : good(value), bad{static_cast<T>(others)...} {}
+
+    T good;
+    std::vector<T> bad;
+};
+
+template <typename Result, typename... Types>
+void Refuses(const char *module, Result (*function)(Types...), std::type_identity_t<Argument<Types>>... arguments)
+{
+    const auto spoil = [&]<size_t at>(std::integral_constant<size_t, at>, const auto &argument) {
+        for (size_t i = 0; i < argument.bad.size(); ++i) {
+            std::tuple<Types...> values(arguments.good...);
+            std::get<at>(values) = argument.bad[i];
+            test::ForgetFault();
+            const Result result = std::apply(function, values);
+            EXPECT_EQ(test::LastFault(), (test::Fault{ERR_BAD_PARAMETERS, module}))
+                << "argument " << at << ", value " << i;
+            if constexpr (std::is_pointer_v<Result>)
+                EXPECT_EQ(result, nullptr) << module;
+            else
+                EXPECT_TRUE(result == 0 || result == static_cast<Result>(-1)) << module << " returns " << result;
+        }
+    };
+    [&]<size_t... at>(std::index_sequence<at...>)
+    {
+        (spoil(std::integral_constant<size_t, at>(), arguments), ...);
+    }
+    (std::index_sequence_for<Types...>());
+}
+
+char text[64] = "";
+unsigned char bytes[512] = {};
+int number = 0;
+int32_t number32 = 0;
+uint64_t number64 = 0;
+TLIBSZLIST *no_list = nullptr;
+TLIBSZHASH *no_hash = nullptr;
+
+class Refusals : public testing::Test {
+  protected:
+    ~Refusals() override
+    {
+        TLIBSzListFree(list_);
+        TLIBSzHashFree(hash_);
+    }
+
+    TLIBSZLIST *list_ = PslTLIBSzListAlloc(64);
+    TLIBSZHASH *hash_ = PshTLIBSzHashAlloc(64);
+};
+
+TEST_F(Refusals, Core)
+{
+    Refuses("file_add_line", TLIBFileAddLine, "/none", {0, -1}, "x");
+    Refuses("file_add_line_by_key", TLIBFileAddLineByKey, "/none", "key", "x");
+    Refuses("file_append_key", TLIBFileAppendKey, "/none", "key", "x", {MayBeNull(), nullptr, "%d"});
+    Refuses("file_check_key_value", BlTAVOFileCheckKeyValue, "/none", "key", "x");
+    Refuses("file_comment", TLIBFileComment, "/none", "key");
+    Refuses("file_get_keys", TLIBFileGetKeys, "/none", {MayBeNull(), list_}, {&hash_, &no_hash}, "=");
+    Refuses("file_get_section", TLIBFileGetSection, "/none", "part", {&hash_, &no_hash});
+    Refuses("file_enum_section", TLIBFileEnumSection, "/none", {&list_, &no_list});
+    Refuses("file_match_line_no", TLIBFileMatchLineNo, "/none", "key");
+    Refuses("file_match_section", TLIBIFileMatchSection, "[part]", 6, "part");
+    Refuses("file_modify_section", TLIBIFileModifySection, "/none", "part", {MayBeNull(), nullptr},
+            {MayBeNull(), hash_}, 0, {MayBeNull(), nullptr});
+    Refuses("file_add_section", ErrTLIBFileAddSection, "/none", "part", hash_, {MayBeNull(), nullptr});
+    Refuses("file_read_lines", TLIBFileReadLines, "/none", {&list_, &no_list});
+    Refuses("file_remove_key", TLIBFileRemoveKey, "/none", "key");
+    Refuses("file_replace_sub_str", TLIBFileReplaceSubStr, "/none", {"old", "", "o\nld"}, {"new", "n\new"});
+    Refuses("file_set_key_value", TLIBFileSetKeyValue, "/none", "key", "x", {MayBeNull(), nullptr, "%d"});
+    Refuses("file_set_keys", TLIBFileSetKeys, "/none", hash_, {MayBeNull(), nullptr});
+    Refuses("file_set_line", TLIBFileSetLine, "/none", {1, 0, -1}, "x");
+    Refuses("file_set_line_by_key", TLIBFileSetLineByKey, "/none", "key", "x");
+    Refuses("file_touch", TLIBFileTouch, "/none/file");
+    Refuses("file_utf8bom_strip", TLIBFileUTF8BomStrip, "/none");
+    Refuses("proc_signal_by_pid_file", TLIBProcSignalByPidFile, "/none", {0, -1});
+    Refuses("ps", TLIBPs, "none", {MayBeNull(), nullptr}, {0, 1});
+    Refuses("read_pid_file", TLIBReadPidFile, "/none");
+    Refuses("sys_remove", TLIBSysRemove, "/none");
+    Refuses("str_decode_colon", TLIBStrDecodeColon, "a", {MayBeNull(), text}, {64, -1});
+    Refuses("str_encode_colon", TLIBStrEncodeColon, "a", text, {64, -1});
+    Refuses("unicode_utf8_str_upper", TLIBUnicodeUTF8StrUpper, "a", text, {64, -1});
+    Refuses("unicode_utf8_str_count_char", TLIBUnicodeUTF8StrCountChar, {"a", "\xff"});
+    Refuses("list_case_find", TLIBSzListCaseFind, list_, "a");
+    Refuses("list_dump_2_str", TLIBSzListDump2Str, list_, ",", text, {64, 0});
+}
+
+TEST_F(Refusals, Storage)
+{
+    static RAIDINFO array = {}, stranger = {};
+    static RAIDINFO *found = nullptr;
+    static RAIDLIST *arrays = nullptr;
+    std::strcpy(array.szPath, "/dev/md2");
+    array.fLevel = RAID_LEVEL_5;
+    std::strcpy(stranger.szPath, "/dev/sda");
+    const RAIDINFO *const good = &array, *const bad = &stranger;
+    static DISKINFO *disk = nullptr;
+    static DISKLIST *disks = nullptr;
+    static TAVODISKINFO *info = nullptr;
+    static int32_t *numbers = nullptr;
+    static RAIDSBENTRY *entry = nullptr;
+    static RAIDSUPERBLOCK superblock;
+    static RAIDPROGRESS progress;
+
+    Refuses("disk_check_power", TAVOIDiskCheckPower, "/dev/none", bytes);
+    Refuses("disk_dd_status_get", DiskDDStatusGet, {"/dev/none", "/dev/"}, &number64, &number64);
+    Refuses("disk_enter_sleep", TAVOIDiskEnterSleep, "/dev/none");
+    Refuses("disk_enum", TAVODiskEnum, {1, 0, 2}, &numbers);
+    Refuses("disk_flush_buffer", TAVOIDiskFlushBuffer, "/dev/none");
+    Refuses("disk_get_info", TAVODiskGetInfo, {1, 0, 2}, 1, &info);
+    Refuses("disk_get_standby_timer", TAVODiskGetStandbyTimer, &number);
+    Refuses("disk_info_enum", DiskInfoEnum, {MayBeNull(), nullptr}, &disks);
+    Refuses("disk_info_get", DiskInfoGet, "/dev/none", &disk);
+    Refuses("disk_is_exist", DiskIsExist, "/dev/none");
+    Refuses("disk_is_mv_soc_driver", TAVODiskIsMvSocDriver, {"/dev/none", "/dev/"});
+    Refuses("disk_is_ssd", TAVODiskIsSSD, "/dev/none");
+    Refuses("disk_list_push", DiskListPush, &disks, {MayBeNull(), nullptr, nullptr});
+    Refuses("disk_partition_num_get", TAVODiskPartitionNumGet, "/dev/none1", text, {64, 1});
+    Refuses("disk_raw_open", TAVOIDiskRawOpen, "/dev/none");
+    Refuses("disk_reset", TAVOIDiskReset, "/dev/none");
+    Refuses("disk_set_disk_standby", TAVOIDiskSetDiskStandby, "/dev/none");
+    Refuses("disk_set_disk_standby_timer", TAVOIDiskSetDiskStandbyTimer, "/dev/none", {0, -1, 256});
+    Refuses("disk_set_file_sb_timer_setting", TAVODiskSetFileSBTimerSetting, {0, -1});
+    Refuses("disk_size_get", DiskSizeGet, "/dev/none", &number64);
+    Refuses("disk_usb_get_info", TAVODiskUSBGetInfo, {"none", "../none"}, &number64);
+    Refuses("disk_write_cache_get", TAVODiskWriteCacheGet, "/dev/none");
+    Refuses("disk_write_cache_set", TAVODiskWriteCacheSet, "/dev/none", 0);
+    Refuses("lnx_disk_get_model", TAVOLnxDiskGetModel, {"/dev/none", "none"}, text, {64, 0});
+    Refuses("smart_data_read", SmartDataRead, "/dev/none", bytes, 0);
+    Refuses("raid_add", RAIDAdd, {good, bad}, {"/dev/sda3", "sda3"});
+    Refuses("raid_add_robust_check", RAIDAddRobustCheck, good, {"/dev/sda3", "sda3"});
+    Refuses("raid_assemble", RAIDAssemble, {"/dev/md2", "/dev/sda"}, {"0:0:0:0", "", "none"});
+    Refuses("raid_assemble_by_info", RAIDAssembleByInfo, {good, bad});
+    Refuses("raid_bad_sector_remap", RAIDBadSectorRemap, {"/dev/md2", "/dev/sda"}, 0);
+    Refuses("raid_dev_count_change", RAIDDevCountChange, {good, bad}, {2, 0});
+    Refuses("raid_disk_is_used_by_raid", RAIDDiskIsUsedByRAID, {"/dev/sda", "sda3"}, {MayBeNull(), nullptr});
+    Refuses("raid_expansible", RAIDExpansible, good, &number64);
+    Refuses("raid_info_dup", RAIDInfoDup, good);
+    Refuses("raid_info_enum", RAIDInfoEnum, &arrays);
+    Refuses("raid_info_get", RAIDInfoGet, {"/dev/md2", "/dev/sda"}, &found);
+    Refuses("raid_ioctl_status", RAIDIoctlStatus, {0, -1}, &number);
+    Refuses("raid_list_push", RAIDListPush, &arrays, {MayBeNull(), nullptr, nullptr});
+    Refuses("raid_list_search", RAIDListSearch, {MayBeNull(), nullptr}, "/dev/md2", &found);
+    Refuses("raid_md_stripe_cache_size_set", TAVORAIDMdStripeCacheSizeSet, {"/dev/md2", "/dev/sda"}, {1, 0});
+    Refuses("raid_md_tuning_performance", TAVORAIDMdTuningPerformance, {"/dev/md2", "/dev/sda"});
+    Refuses("raid_migrate2_raid6", RAIDMigrate2RAID6, {good, bad}, list_);
+    Refuses("raid_path_enum", RAIDPathEnum, {&list_, &no_list});
+    Refuses("raid_rebuild_status_get", RAIDRebuildStatusGet, {0, -1}, &progress);
+    Refuses("raid_rebuilding_multi_wait", RAIDRebuildingMultiWait, list_);
+    Refuses("raid_rebuilding_wait", RAIDRebuildingWait, {"/dev/md2", "/dev/sda"});
+    Refuses("raid_remove", RAIDRemove, {good, bad});
+    Refuses("raid_remove_disk", RAIDRemoveDisk, {good, bad}, {"/dev/sda3", "sda3"});
+    Refuses("raid_remove_multiple", RAIDRemoveMultiple, list_);
+    Refuses("raid_replace_disk", RAIDReplaceDisk, {good, bad}, {MayBeNull(), nullptr, "sda3"},
+            {"/dev/sda", "sda3", "/dev/sda3"});
+    Refuses("raid_sb_clean", RAIDSBClean, {"/dev/sda3", "sda3"});
+    Refuses("raid_sb_clean_by_uuid", RAIDSBCleanByUUID, {MayBeNull(), nullptr}, {"0:0:0:0", "", "none"});
+    Refuses("raid_sb_enum", RAIDSBEnum, list_, &entry);
+    Refuses("raid_sb_get", RAIDSBGet, {"/dev/sda3", "sda3"}, &superblock);
+    Refuses("raid_size_unalloc_get", RAIDSizeUnallocGet, good, &number64);
+    Refuses("raid_stop", RAIDStop, {"/dev/md2", "/dev/sda"});
+    Refuses("raid_uuid_get", RAIDUUIDGet, {MayBeNull(), "/dev/md2"}, text, {64, 0});
+}
+
+TEST_F(Refusals, Accounts)
+{
+    static TAVOBDB store = {};
+    static TAVOUSER *user = nullptr;
+    static TAVOGROUP *group = nullptr;
+    static const char *const names[] = {"none", nullptr};
+    static const TAVOUSER *const users[] = {nullptr};
+    static void *data = nullptr;
+    static TAVOQUOTA quota;
+    static const float limit = 1, below = -1;
+
+    Refuses("bdb_close", TAVOBDbClose, {MayBeNull(), nullptr, nullptr});
+    Refuses("bdb_conf_sync_time_get", TAVOBDbConfSyncTimeGet, &store, &number32);
+    Refuses("bdb_cursor_get", TAVOBDbCursorGet, &store, 0, &data, &number, &data, &number);
+    Refuses("bdb_cursor_set_type", TAVOBDbCursorSetType, &store, {TAVO_BDB_CURSOR_KEY, -1, 100});
+    Refuses("bdb_delete", TAVOBDbDelete, &store, "key", {3, 0});
+    Refuses("bdb_deprecated_get", TAVOBDbDeprecatedGet, &store, &number32);
+    Refuses("bdb_domain_expire_time_get", TAVOBDbDomainExpireTimeGet, &store, &number32);
+    Refuses("bdb_get", TAVOBDbGet, &store, "key", {3, 0}, &data, &number);
+    Refuses("bdb_open", TAVOBDbOpen, {"/none", ""}, 0, 0);
+    Refuses("bdb_set", TAVOBDbSet, &store, "key", {3, 0}, "x", {1, -1});
+    Refuses("group_alloc", TAVOGroupAlloc, &group, "none:x:1:");
+    Refuses("group_alloc2", TAVOGroupAlloc2, &group, {"none", ""}, 1, {MayBeNull(), nullptr});
+    Refuses("group_delete", TAVOGroupDelete, names, {1, -1});
+    Refuses("group_desc_get", TAVOGroupDescGet, {"none", ""}, text, {64, -1});
+    Refuses("group_desc_set", TAVOGroupDescSet, {"none", ""}, {MayBeNull(), "x", "a\nb"});
+    Refuses("group_enum", TAVOGroupEnum, {&list_, &no_list}, TAVO_GROUP_LOCAL);
+    Refuses("group_enum_by_prefix", TAVOGroupEnumByPrefix, {&list_, &no_list}, TAVO_GROUP_LOCAL, "x");
+    Refuses("group_enum_by_substr", TAVOGroupEnumBySubstr, {&list_, &no_list}, TAVO_GROUP_LOCAL, "x");
+    Refuses("group_get", TAVOGroupGet, {"none", ""}, &group);
+    Refuses("group_get_by_gid", TAVOGroupGetByGID, 1, &group);
+    Refuses("group_list_member", TAVOGroupListMember, {"none", ""}, {&list_, &no_list});
+    Refuses("user_modify_group", TAVOUserModifyGroup, hash_);
+    Refuses("quota_clean", TAVOQuotaClean, list_, {"/dev/none", ""});
+    Refuses("quota_clean_all_vols", TAVOQuotaCleanAllVols, list_);
+    Refuses("quota_fmt_get", TAVOQuotaFmtGet, {"/dev/none", ""});
+    Refuses("quota_get", TAVOQuotaGet, {"none", ""}, {"/dev/none", ""}, &quota);
+    Refuses("quota_set", TAVOQuotaSet, {"none", ""}, {"/dev/none", ""}, {&limit, &below});
+    Refuses("quota_init", TAVOQuotaInit, {1, 77});
+    Refuses("quota_off", TAVOQuotaOff, {1, 77});
+    Refuses("smb_lm_hash", TLIBSmbLmHash, "x", bytes);
+    Refuses("smb_md4_hash", TLIBSmbMd4Hash, "x", bytes);
+    Refuses("user_aging_set", TAVOUserAgingSet, {MayBeNull(), "none"}, {0, -2}, {0, -2}, {0, -2});
+    Refuses("user_delete", TAVOUserDelete, names, {1, -1});
+    Refuses("user_enum", TAVOUserEnum, {&list_, &no_list}, TAVO_USER_LOCAL);
+    Refuses("user_enum_by_prefix", TAVOUserEnumByPrefix, {&list_, &no_list}, TAVO_USER_LOCAL, "x");
+    Refuses("user_enum_by_substr", TAVOUserEnumBySubstr, {&list_, &no_list}, TAVO_USER_LOCAL, "x");
+    Refuses("user_get", TAVOUserGet, {"none", ""}, &user);
+    Refuses("user_get_by_uid", TAVOUserGetByUID, 1, &user);
+    Refuses("user_get_valid_user_list", TAVOUserGetValidUserList, names, text, {64, -1});
+    Refuses("user_privilege_get", TAVOUserPrivilegeGet, {"none", ""});
+    Refuses("user_set", TAVOUserSet, names, users, {1, -1});
+    Refuses("user_set_passwd", TAVOUserSetPasswd, users, names, names, names, {1, -1});
+}
+
+TEST_F(Refusals, Network)
+{
+    static TAVONETCARD card;
+    static TAVONETLINKAGGR bond = {};
+
+    Refuses("fhost_get2_hash", TAVOFHOSTGet2Hash, {&hash_, &no_hash});
+    Refuses("conf_get_mtu_value", TAVOConfGetMTUValue, {"eth0", "../x"}, text, {64, 0});
+    Refuses("conf_set_mtu_value", TAVOConfSetMTUValue, {"eth0", "../x"}, {1500, -1});
+    Refuses("lnx_get_hostname", TAVOLnxGetHostname, text, {64, 0});
+    Refuses("lnx_is_dhcp", BlTAVOLnxIsDHCP, {"eth0", "../x"});
+    Refuses("lnx_set_hostname", TAVOLnxSetHostname, "tavo");
+    Refuses("net_address_probe", TAVONetAddressProbe, {"eth0", "../x"}, {"10.0.0.1", "10.0.0", "0.0.0.0"}, {1, 0});
+    Refuses("net_default_gateway_get", TAVONetDefaultGatewayGet, text, {64, 0});
+    Refuses("net_default_gateway_get_conf", TAVONetDefaultGatewayGetConf, text, {64, 0});
+    Refuses("net_default_gateway_set", TAVONetDefaultGatewaySet, {MayBeNull(), "10.0.0.1", nullptr});
+    Refuses("net_dhcp6_wait", TAVONetDhcp6Wait, {"eth0", "../x"}, {0, -1});
+    Refuses("net_dhcp_test", TAVONetDhcpTest, {"eth0", "../x"}, {1, 0});
+    Refuses("net_dns_get", TAVONetDNSGet, {&list_, &no_list});
+    Refuses("net_dns_set", TAVONetDNSSet, list_);
+    Refuses("net_get_card", TAVONetGetCard, {"eth0", "../x"}, &card);
+    Refuses("net_get_card1", TAVONetGetCard1, &card);
+    Refuses("net_ip_conflict", TAVOIIpConflict, {"eth0", "../x"}, {"10.0.0.1", "10.0.0"});
+    Refuses("net_ipv6_addr_enum", TAVONetIPv6AddrEnum, {"eth0", "../x"}, {&list_, &no_list});
+    Refuses("net_ipv6_is_enabled", BlTAVONetIPv6IsEnabled, {"eth0", "../x"});
+    Refuses("net_ipv6_set", TAVONetIPv6Set, {"eth0", "../x"}, 0);
+    Refuses("net_is_connected", BlTLIBIsConnected, {"eth0", "../x"});
+    Refuses("net_is_port_in_use", BlTLIBIsPortInUse, {1, 0, 65536});
+    Refuses("net_link_aggr_enum", TAVONetLinkAggrEnum, {&list_, &no_list});
+    Refuses("net_link_aggr_get", TAVONetLinkAggrGet, {"bond0", "../x"}, &bond);
+    Refuses("net_link_aggr_opt_slsave_add", TAVONetLinkAggrOptSlsaveAdd, &bond, {"eth0", "../x"});
+    Refuses("net_link_aggr_phy_get", TAVONetLinkAggrPhyGet, {"bond0", "../x"}, {&list_, &no_list});
+    Refuses("net_set_card1", TAVONetSetCard1, {&card, &card}, {MayBeNull(), nullptr});
+    Refuses("net_set_mtu_eth", TAVONetSetMTUEth, {"eth0", "../x"}, {1500, -1});
+    Refuses("net_wol_get", TAVONetWolGet, {"eth0", "../x"});
+    Refuses("net_wol_set", TAVONetWolSet, {"eth0", "../x"}, 0);
+}
+
+TEST_F(Refusals, Services)
+{
+    static TAVOEBOX *box = nullptr;
+    static TAVOSERVICESHARE share;
+
+    Refuses("ebox_info_enum", TAVOEBoxInfoEnum, &box);
+    Refuses("push_duser_used", TAVOPushDUserUsed, {&list_, &no_list});
+    Refuses("user_modify_smb_conf", TAVOUserModifySmbConf, hash_);
+    Refuses("service_action_set", TAVOServiceActionSet, {0, -1, 31}, TAVO_SERVICE_START);
+    Refuses("service_daemon_get", TAVOServiceDaemonGet, {"none", ""});
+    Refuses("service_data_search", TAVOServiceDataSearch, 1, text, 64);
+    Refuses("service_disable_set", TAVOServiceDisableSet, {1, -1, 12});
+    Refuses("service_enable_get", TAVOServiceEnableGet, {1, -1, 12});
+    Refuses("service_get_all", TAVOServiceGetAll, {&list_, &no_list});
+    Refuses("service_getby_volume", TAVOServiceGetbyVolume, {"/volume1", "/tmp"}, {&list_, &no_list});
+    Refuses("service_is_on_volume", TAVOServiceIsOnVolume, 1, {"/volume1", "/tmp"});
+    Refuses("service_link_remove", TAVOServiceLinkRemove, {1, -1, 12});
+    Refuses("service_link_set", TAVOServiceLinkSet, 1, {"/volume1/web", ""});
+    Refuses("service_new_volume_decide", TAVOServiceNewVolumeDecide, {1, -1, 12}, text, {64, 0});
+    Refuses("service_remove", TAVOServiceRemove, {1, -1, 12}, 0);
+    Refuses("service_removeby_id", TAVOServiceRemovebyID, {1, -1, 31}, 0);
+    Refuses("service_removeby_volume", TAVOServiceRemovebyVolume, {"/volume1", "/tmp"}, 0);
+    Refuses("service_restore", TAVOServiceRestore, {"/volume1", "/tmp"});
+    Refuses("service_setting_get", TAVOServiceSettingGet, {1, -1, 12}, &share);
+    Refuses("service_share_gen", TAVOServiceShareGen, 1, {"/volume1", "/tmp"}, text, {64, 0});
+    Refuses("service_share_is_empty", TAVOServiceShareIsEmpty, {1, -1, 12});
+    Refuses("service_share_remove", TAVOServiceShareRemove, {1, -1, 12}, 0);
+    Refuses("service_status_get", TAVOServiceStatusGet, {1, -1, 30});
+    Refuses("service_std_action", TAVOServiceSTDAction, TAVOServiceInfoGet(0), {0, -1, 100});
+    Refuses("service_std_status", TAVOServiceSTDStatus, {TAVOServiceInfoGet(0), TAVOServiceInfoGet(30)});
+    Refuses("service_printer_status", TAVOServicePrinterStatus, {TAVOServiceInfoGet(0), TAVOServiceInfoGet(30)});
+    Refuses("service_telnet", TAVOServiceTelnet, TAVOServiceInfoGet(13), {TAVO_SERVICE_STOP, -1, 100});
+    Refuses("service_third_party_all", TAVOServiceThirdPartyAll, {"start", "begin", ""});
+    Refuses("service_volume_getby_link", TAVOServiceVolumeGetbyLink, {"web", ""}, text, {64, 0}, text, {64, 0});
+    Refuses("service_volume_getby_share", TAVOServiceVolumeGetbyShare, {"web", ""}, text, {64, 0});
+}
+
+// Names that no account or host can have, and buffers that are too small, have codes of their own.
+TEST_F(Refusals, NamesAndBuffers)
+{
+    static TAVOUSER *user = nullptr;
+    static TAVOGROUP *group = nullptr;
+    const auto fails = [](int code, const char *module, int result) {
+        EXPECT_EQ(result, -1) << module;
+        EXPECT_EQ(test::LastFault(), (test::Fault{code, module}));
+        test::ForgetFault();
+    };
+    fails(ERR_INVALID_USERNAME, "user_get", TAVOUserGet("\xff", &user));
+    fails(ERR_INVALID_USERNAME, "user_privilege_get", TAVOUserPrivilegeGet("\xff"));
+    fails(ERR_INVALID_GROUPNAME, "group_get", TAVOGroupGet("\xff", &group));
+    fails(ERR_INVALID_GROUPNAME, "group_desc_get", TAVOGroupDescGet("\xff", text, sizeof text));
+    fails(ERR_INVALID_GROUPNAME, "group_desc_set", TAVOGroupDescSet("\xff", "x"));
+    fails(ERR_INVALID_NETNAME, "lnx_set_hostname", TAVOLnxSetHostname("a b"));
+    fails(ERR_INVALID_NETNAME, "net_default_gateway_set", TAVONetDefaultGatewaySet("10.0.0"));
+    fails(ERR_NOT_ENOUGH_MEMORY, "service_share_gen", TAVOServiceShareGen(1, "/volume1", text, 12));
+}
+
+}  // namespace
