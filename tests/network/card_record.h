@@ -5,6 +5,7 @@
 #include "tavo_net.h"
 
 #include <cstring>
+#include <vector>
 
 namespace test {
 
@@ -18,14 +19,14 @@ inline TAVONETCARD Card(int mode, const char *address = "", const char *mask = "
     return card;
 }
 
-inline TAVONETLINKAGGR Bond()
+inline TAVONETLINKAGGR Bond(int mode = TAVO_NET_AGGR_BACKUP,
+                            const std::vector<const char *> &members = {"eth0", "eth1"})
 {
     TAVONETLINKAGGR bond = {};
     std::strcpy(bond.szBond, "bond0");
-    bond.nMode = TAVO_NET_AGGR_BACKUP;
-    bond.nMember = 2;
-    std::strcpy(bond.rgszMember[0], "eth0");
-    std::strcpy(bond.rgszMember[1], "eth1");
+    bond.nMode = mode;
+    for (const char *member : members)
+        std::strcpy(bond.rgszMember[bond.nMember++], member);
     return bond;
 }
 

@@ -3,11 +3,14 @@
 #define TESTS_NETWORK_NAMED_PROCESS_H
 
 #include "support/eventually.h"
+#include "support/own_child.h"
 #include "support/scratch_dir.h"
 
 #include <gtest/gtest.h>
 
+#include <optional>
 #include <string>
+#include <utility>
 
 #include <fcntl.h>
 #include <sys/wait.h>
@@ -22,39 +25,29 @@ class NamedProcess {
     {
         int ends[2];
         EXPECT_EQ(::pipe2(ends, O_CLOEXEC), 0);
-        pid_ = ::fork();
-        if (pid_ == 0) {
+        child_.emplace([&] {
             ::dup2(ends[0], 0);
             ::execl("/bin/bash", name.c_str(), "-c", "read x; :", "-f", argument, nullptr);
-            ::_exit(127);
-        }
+        });
         ::close(ends[0]);
         input_ = ends[1];
-        const std::string line = "/proc/" + std::to_string(pid_) + "/cmdline";
+        const std::string line = "/proc/" + std::to_string(Pid()) + "/cmdline";
         EXPECT_TRUE(Eventually([&] { return ReadFile(line).starts_with(name); }));
     }
-    ~NamedProcess()
-    {
-        if (input_ >= 0)
-            End();
-    }
-    NamedProcess(const NamedProcess &) = delete;
-    NamedProcess &operator=(const NamedProcess &) = delete;
+    ~NamedProcess() { ::close(input_); }
 
     // The signal that it died of, 0 for none.
     int End()
     {
-        ::close(input_);
-        input_ = -1;
-        int status = 0;
-        ::waitpid(pid_, &status, 0);
+        ::close(std::exchange(input_, -1));
+        const int status = child_->Status();
         return WIFSIGNALED(status) ? WTERMSIG(status) : 0;
     }
 
-    pid_t Pid() const { return pid_; }
+    pid_t Pid() const { return child_->Pid(); }
 
   private:
-    pid_t pid_ = -1;
+    std::optional<OwnChild> child_;
     int input_ = -1;
 };
 

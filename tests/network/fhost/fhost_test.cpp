@@ -4,15 +4,15 @@
 #include "network/named_process.h"
 #include "network/net/cards.h"
 #include "support/appliance_root.h"
+#include "support/own_child.h"
+#include "support/string_hash.h"
 
 #include <chrono>
-#include <csignal>
 #include <functional>
 
 #include <fcntl.h>
 #include <sys/file.h>
 #include <sys/socket.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 using test::Cards;
@@ -22,7 +22,6 @@ using test::WriteFile;
 using testing::ElementsAre;
 using testing::EndsWith;
 using testing::IsEmpty;
-using testing::MatchesRegex;
 
 namespace {
 
@@ -83,6 +82,11 @@ TEST_F(Discovery, TheQueryLeavesTwiceFromEveryCard)
     const Sent first = {"192.0.2.10:0", "255.255.255.255:9999", kQuery};
     const Sent second = {"198.51.100.10:0", "255.255.255.255:9999", kQuery};
     EXPECT_TRUE(sent == std::vector<Sent>({first, second, first, second}));
+    sent.clear();
+    for (int i = 0; i < 10; ++i)
+        AddCard("eth" + std::to_string(i), "192.0.2." + std::to_string(10 + i));
+    EXPECT_EQ(ErrFHOSTSendBroadcastUdp("x", 1), 0u);
+    EXPECT_EQ(sent.size(), 8u) << "ten cards are more than are asked";
 }
 
 TEST_F(Discovery, EachFailureIsABitAndTheOthersAreTried)
@@ -101,9 +105,10 @@ TEST_F(Discovery, EachFailureIsABitAndTheOthersAreTried)
     ASSERT_EQ(sent.size(), 2u);
     EXPECT_EQ(sent[1].from, "192.0.2.20:0") << "the last one";
     EXPECT_EQ(sent[1].bytes, "hello");
-    EXPECT_THAT(log_.Texts(), ElementsAre(MatchesRegex("bind\\(sockfd=[0-9]+, brdcast.sin_addr.s_addr = [0-9]+\\) "
-                                                       "error!! errno=99, err_str=\\[.*\\]"),
-                                          "sendto error."));
+    EXPECT_THAT(log_.Texts(),
+                ElementsAre(testing::MatchesRegex("bind\\(sockfd=[0-9]+, brdcast.sin_addr.s_addr = [0-9]+\\) "
+                                                  "error!! errno=99, err_str=\\[.*\\]"),
+                            "sendto error."));
 }
 
 // A port without a cable is not a failure, and the ports after it keep their bits.
@@ -121,14 +126,6 @@ TEST_F(Discovery, SkipsCardsWithoutAnAddress)
     EXPECT_EQ(sent.size(), 1u);
     no_send_from = "192.0.2.13:0";
     EXPECT_EQ(ErrFHOSTSendBroadcastUdp("x", 1), 0x8u);
-}
-
-TEST_F(Discovery, TenCardsAreMoreThanAreAsked)
-{
-    for (int i = 0; i < 10; ++i)
-        AddCard("eth" + std::to_string(i), "192.0.2." + std::to_string(10 + i));
-    EXPECT_EQ(ErrFHOSTSendBroadcastUdp("x", 1), 0u);
-    EXPECT_EQ(sent.size(), 8u);
 }
 
 // This process, as the daemon does it: with the lock of the pid file.
@@ -158,7 +155,7 @@ TEST_F(Discovery, WithoutADaemonNothingIsCollected)
     WriteFile("/usr/tavo/bin/findhostd", "#!/bin/sh\nexit 1\n", 0755);
     EXPECT_EQ(TAVOFHOSTDumpHost(), -1);
     EXPECT_THAT(Sleeps(), ElementsAre("sleep 3"));
-    EXPECT_THAT(log_.Texts().at(0), MatchesRegex("fhost_dump_host\\([0-9]+\\): findhostd daemon is not running ...."));
+    EXPECT_THAT(log_.Take(), testing::StartsWith("fhost_dump_host(#): findhostd daemon is not running ...."));
     EXPECT_THAT(sent, IsEmpty());
 }
 
@@ -171,27 +168,22 @@ TEST_F(Discovery, OnlyTheLockOfThePidFileIsADaemon)
     const Daemon daemon;
     log_.Clear();
     EXPECT_EQ(TAVOFHOSTDumpHost(), 0);
-    EXPECT_THAT(log_.Texts(), IsEmpty());
+    EXPECT_EQ(log_.Take(), "");
     if (test::RootLacks("uids"))
         return;
     std::filesystem::remove(Daemon::kPidFile);
     WriteFile(Daemon::kPidFile, std::to_string(::getpid()) + "\n");
     int ready[2];
     ASSERT_EQ(::pipe2(ready, O_CLOEXEC), 0);
-    const pid_t nobody = ::fork();
-    if (nobody == 0) {
+    const test::OwnChild nobody([&] {
         const int fd = ::setresuid(65534, 65534, 65534) == 0 ? ::open(Daemon::kPidFile, O_RDONLY) : -1;
-        if (fd >= 0 && ::flock(fd, LOCK_EX) == 0)
-            (void)!::write(ready[1], "", 1);
-        ::pause();
-        ::_exit(0);
-    }
+        if (fd >= 0 && ::flock(fd, LOCK_EX) == 0 && ::write(ready[1], "", 1) == 1)
+            ::pause();
+    });
     char byte;
     EXPECT_EQ(::read(ready[0], &byte, 1), 1);
     EXPECT_EQ(TAVOFHOSTDumpHost(), 0) << "it is started, and its pid is there";
     EXPECT_THAT(log_.Texts().at(0), EndsWith("findhostd daemon is not running ...."));
-    ::kill(nobody, SIGKILL);
-    ::waitpid(nobody, nullptr, 0);
 }
 
 struct Heard {
@@ -252,9 +244,8 @@ TEST_F(Discovery, MovesTheListToItsCaller)
     EXPECT_FALSE(std::filesystem::exists(kList));
 
     no_send_from = "192.0.2.10:0";
-    log_.Clear();
     EXPECT_EQ(TAVOFHOSTDumpHost(), -1);
-    EXPECT_THAT(log_.Texts().back(), EndsWith("): ErrFHOSTSendQueryPkt() failed!"));
+    EXPECT_THAT(log_.Take(), EndsWith("fhost_dump_host(#): ErrFHOSTSendQueryPkt() failed!"));
     EXPECT_EQ(ReadFile(kList), "") << "made for the daemon";
 }
 
@@ -283,22 +274,9 @@ TEST_F(Discovery, RemovesForeignFilesAtTheListPath)
     }
 }
 
-class Hosts {
-  public:
-    ~Hosts() { TLIBSzHashFree(hash_); }
-
-    std::string operator[](const char *key) const
-    {
-        const char *const value = SzTLIBSzHashGetValue(hash_, key);
-        return value ? value : "none";
-    }
-
-    TLIBSZHASH *hash_ = PshTLIBSzHashAlloc(1024);
-};
-
 TEST_F(Discovery, TheListIsReadLineByLine)
 {
-    Hosts hosts;
+    test::StringHash hosts;
     WriteFile(kTaken, "1,240,host,10.0.0.5,x\n"
                       "  2,239,old,10.0.0.6,x  \n"
                       "0,240,nomodel,10.0.0.7,x\n"
@@ -309,16 +287,17 @@ TEST_F(Discovery, TheListIsReadLineByLine)
                       "1,240,host,10.0.0.5,again\n"
                       "1,240,liar,10.0.0.5;x,x\n"
                       "1,240,\x1B[2J,10.0.0.10,x");
-    EXPECT_EQ(TAVOFHOSTGet2Hash(&hosts.hash_), 3);
-    EXPECT_EQ(hosts["host(10.0.0.5)"], "10.0.0.5");
-    EXPECT_EQ(hosts["other(10.0.0.9)"], "10.0.0.9");
-    EXPECT_EQ(hosts["\x1B[2J(10.0.0.10)"], "10.0.0.10") << "showing it safely is the reader's affair";
-    EXPECT_THAT(log_.Texts(),
-                ElementsAre(EndsWith(" model number == 0"), EndsWith(" model number == 0"),
-                            EndsWith(" field number < 5"), EndsWith(" field number < 5"), EndsWith(" not an address")));
+    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts.Addr()), 3);
+    // Showing the names safely is the reader's affair.
+    EXPECT_EQ(hosts.All(), (test::Pairs{{"host(10.0.0.5)", "10.0.0.5"},
+                                        {"other(10.0.0.9)", "10.0.0.9"},
+                                        {"\x1B[2J(10.0.0.10)", "10.0.0.10"}}));
+    EXPECT_EQ(log_.Take(), "fhost_get2_hash:# model number == 0\nfhost_get2_hash:# model number == 0\n"
+                           "fhost_get2_hash:# field number < 5\nfhost_get2_hash:# field number < 5\n"
+                           "fhost_get2_hash:# not an address");
     EXPECT_FALSE(std::filesystem::exists(kTaken));
 
-    EXPECT_EQ(TAVOFHOSTGet2Hash(&hosts.hash_), 0);
+    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts.Addr()), 0);
     EXPECT_EQ(LastFault(), (test::Fault{ERR_OPEN_FAILED, "fhost_get2_hash"}));
     EXPECT_EQ(TAVOFHOSTGet2Hash(nullptr), -1);
     EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
@@ -326,31 +305,31 @@ TEST_F(Discovery, TheListIsReadLineByLine)
 
 TEST_F(Discovery, AHashThatMustGrowStaysTheCallers)
 {
-    Hosts hosts;
+    test::StringHash hosts;
     std::string list;
     for (int i = 0; i < 2000; ++i)
         list += "1,240," + std::string(250, 'n') + std::to_string(i) + ",10.0." + std::to_string(i / 200) + "." +
                 std::to_string(i % 200 + 1) + ",x\n";
     WriteFile(kTaken, list);
-    EXPECT_EQ(TAVOFHOSTGet2Hash(&hosts.hash_), 2000);
+    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts.Addr()), 2000);
 }
 
 TEST_F(Discovery, AListThatIsNotOursIsNotRead)
 {
-    Hosts hosts;
+    test::StringHash hosts;
     test::ScratchDir elsewhere;
     const std::string secret = elsewhere / "list";
     WriteFile(secret, "1,240,host,10.0.0.5,x\n");
     std::filesystem::create_symlink(secret, kTaken);
-    EXPECT_EQ(TAVOFHOSTGet2Hash(&hosts.hash_), 0);
+    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts.Addr()), 0);
     EXPECT_EQ(TLIBErrGet(), ERR_OPEN_FAILED);
     std::filesystem::remove(kTaken);
     ASSERT_EQ(::mkfifo(kTaken, 0666), 0);
-    EXPECT_EQ(TAVOFHOSTGet2Hash(&hosts.hash_), 0) << "and it does not wait";
+    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts.Addr()), 0) << "and it does not wait";
     std::filesystem::remove(kTaken);
     WriteFile(kTaken, "1,240,host,10.0.0.5,x\n");
     if (::chown(kTaken, 1000, 1000) == 0) {
-        EXPECT_EQ(TAVOFHOSTGet2Hash(&hosts.hash_), 0) << "another user's";
+        EXPECT_EQ(TAVOFHOSTGet2Hash(hosts.Addr()), 0) << "another user's";
     }
     EXPECT_TRUE(std::filesystem::exists(secret));
 }

@@ -3,9 +3,7 @@
 #include "tavo_net.h"
 
 #include "network/card_record.h"
-#include "network/network_change.h"
-#include "network/network_state.h"
-#include "support/fault_state.h"
+#include "support/container_text.h"
 #include "support/network_scene.h"
 #include "support/rounds.h"
 #include "support/traced_call.h"
@@ -17,15 +15,24 @@
 #include <cstring>
 #include <filesystem>
 #include <functional>
+#include <iterator>
 #include <optional>
+#include <sstream>
+#include <string>
+#include <vector>
 
+#include <arpa/inet.h>
+#include <netdb.h>
+#include <netinet/in.h>
 #include <sys/mount.h>
+#include <sys/socket.h>
+#include <sys/utsname.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
+using test::Bond;
 using test::Card;
-using test::NetworkChange;
-using test::NetworkState;
+using test::kIfcfg;
 using test::Node;
 using test::ReadFile;
 using test::ShellStatus;
@@ -34,6 +41,208 @@ using test::WriteFile;
 namespace {
 
 constexpr const char *kRecord = "/etc/network.undo";
+
+std::string TextOrNone(const char *path)
+{
+    return std::filesystem::exists(path) ? ReadFile(path) : "none";
+}
+
+// Without the temporary ones that a death leaves: a dot and six characters at the end.
+std::string InterfaceFiles()
+{
+    std::vector<std::string> files;
+    for (const auto &entry : std::filesystem::directory_iterator("/etc/sysconfig/network-scripts")) {
+        if (entry.path().extension().string().size() != 7)
+            files.push_back(entry.path().string() + "\n" + ReadFile(entry.path()));
+    }
+    std::sort(files.begin(), files.end());
+    std::string text;
+    for (const std::string &file : files)
+        text += file;
+    return text;
+}
+
+// Addresses and routes, without those that the kernel makes by itself.
+std::string IPv6State()
+{
+    std::string state = TextOrNone("/proc/sys/net/ipv6/conf/eth0/disable_ipv6");
+    const auto add = [&](const char *table, size_t fields, auto is_ours) {
+        std::istringstream lines(TextOrNone(table));
+        for (std::string line; std::getline(lines, line);) {
+            std::istringstream words(line);
+            const std::vector<std::string> field = {std::istream_iterator<std::string>(words), {}};
+            if (field.size() == fields && field.back() == "eth0" && !line.starts_with("f") && is_ours(field))
+                state += field[0] + "/" + field[fields == 6 ? 2 : 1] + " " + field[fields == 6 ? 3 : 4] + "\n";
+        }
+    };
+    add("/proc/net/if_inet6", 6, [](const auto &) { return true; });
+    add("/proc/net/ipv6_route", 10, [](const auto &field) {
+        return (std::stoul(field[8], nullptr, 16) & 0x80100000) == 0;  // local, anycast
+    });
+    return state;
+}
+
+// All that a change may leave half done.
+std::string NetworkState()
+{
+    std::string state = InterfaceFiles() + IPv6State();
+    for (const char *path : {"/etc/sysconfig/network", "/etc/hosts", "/etc/resolv.conf", "/proc/net/route",
+                             "/sys/class/net/eth0/mtu", "/etc/tavoinfo.conf"})
+        state += std::string(path) + "\n" + TextOrNone(path);
+    utsname name;
+    ::uname(&name);
+    TAVONETCARD card = {};
+    TAVONetGetCard1(&card);
+    return state + name.nodename + "\n" + card.szInterface + " " + card.szIp + "/" + card.szMask;
+}
+
+bool HasDefaultRoute()
+{
+    const std::string routes = TextOrNone("/proc/net/route");
+    return routes.find("\neth0\t00000000\t") != routes.npos || routes.find("\nbond0\t00000000\t") != routes.npos;
+}
+
+// What the C library finds under the appliance's own name.
+std::string OwnAddress()
+{
+    char name[256] = "";
+    ::gethostname(name, sizeof name - 1);
+    addrinfo hints{};
+    hints.ai_family = AF_INET;
+    addrinfo *found = nullptr;
+    if (::getaddrinfo(name, nullptr, &hints, &found) != 0)
+        return "none";
+    sockaddr_in address;
+    std::memcpy(&address, found->ai_addr, sizeof address);
+    ::freeaddrinfo(found);
+    return ::inet_ntoa(address.sin_addr);
+}
+
+// Gets a lease at once and goes to the background.
+constexpr const char *kQuickClient = R"(#!/bin/sh
+busybox ifconfig "$2" 192.0.2.40 netmask 255.255.255.0
+busybox route add default gw 192.0.2.98
+printf 'IPADDR=192.0.2.40\nNETMASK=255.255.255.0\nGATEWAY=192.0.2.98\n' >/etc/dhcpc/dhcpcd-"$2".info
+)";
+
+int SetAddress(const char *address)
+{
+    const TAVONETCARD card = Card(TAVO_NET_STATIC, address, "255.255.255.0");
+    return TAVONetSetCard1(&card, &card);
+}
+
+int SetDhcp()
+{
+    const TAVONETCARD card = Card(TAVO_NET_DHCP);
+    return TAVONetSetCard1(&card, &card);
+}
+
+void BackToStatic()
+{
+    ShellStatus("busybox ifconfig eth0 0.0.0.0");
+    WriteFile(kIfcfg, "DEVICE=eth0\nONBOOT=yes\nBOOTPROTO=static\nIPADDR=192.0.2.20\nNETMASK=255.255.255.0\n"
+                      "BROADCAST=192.0.2.255\nNETWORK=192.0.2.0\n");
+    EXPECT_EQ(SetAddress("192.0.2.20"), 0);
+}
+
+int SetServer(const char *server)
+{
+    return TAVONetDNSSet(test::MakeList({server}).get());
+}
+
+bool HasIPv6Address()
+{
+    return ShellStatus("grep -q ^20010db8 /proc/net/if_inet6") == 0;
+}
+
+bool HasIPv6Route()
+{
+    return ShellStatus("grep -q ^20010db800010000 /proc/net/ipv6_route") == 0;
+}
+
+int AddIPv6Address()
+{
+    return TAVONetIPv6AddrAdd("eth0", "2001:db8::20", 64);
+}
+
+int RemoveIPv6Address()
+{
+    return TAVONetIPv6AddrDel("eth0", "2001:db8::20", 64);
+}
+
+int AddIPv6Route()
+{
+    return TAVONetIPv6RouteAdd("eth0", "2001:db8:1::", 48, "2001:db8::1");
+}
+
+int RemoveIPv6Route()
+{
+    return TAVONetIPv6RouteDel("eth0", "2001:db8:1::", 48, "2001:db8::1");
+}
+
+void EnsureIPv6()
+{
+    EXPECT_EQ(TAVONetIPv6Set("eth0", 1), 0);
+    if (!HasIPv6Address()) {
+        EXPECT_EQ(AddIPv6Address(), 0);
+    }
+    if (!HasIPv6Route()) {
+        EXPECT_EQ(AddIPv6Route(), 0);
+    }
+}
+
+int MakeBond()
+{
+    const TAVONETLINKAGGR bond = Bond();
+    return TAVONetLinkAggrSet(&bond);
+}
+
+void NoBond()
+{
+    EXPECT_EQ(ShellStatus("/etc/rc.network stop && cd /etc/sysconfig/network-scripts && rm -f * && "
+                          "printf 'DEVICE=eth0\nBOOTPROTO=static\nIPADDR=192.0.2.20\nNETMASK=255.255.255.0\n' "
+                          ">ifcfg-eth0 && printf '# second\nDEVICE=eth1\nBOOTPROTO=none\n' >ifcfg-eth1 && "
+                          "/etc/rc.network start"),
+              0);
+}
+
+void BackFromIPv6Route()
+{
+    EnsureIPv6();
+    EXPECT_EQ(RemoveIPv6Route(), 0);
+}
+
+struct NetworkChange {
+    int (*make)();
+    void (*back)();  // from before the change or from after it
+    const char *name;
+    int stride = 1;  // of a short run
+    enum { nothing, ipv6, client } needs = nothing;
+    int first_command = 1;  // of those whose failure counts
+};
+
+// Every change of the network that has steps: how it is made, and how it is taken back from wherever it stopped.
+const NetworkChange kNetworkChanges[] = {
+    {[] { return SetAddress("192.0.2.60"); }, [] { EXPECT_EQ(SetAddress("192.0.2.20"), 0); }, "Address"},
+    {SetDhcp, BackToStatic, "ToDhcp", 3, NetworkChange::client},
+    {[] { return SetAddress("192.0.2.20"); }, [] { EXPECT_EQ(SetDhcp(), 0); }, "FromDhcp", 3, NetworkChange::client},
+    {[] { return TAVONetDefaultGatewaySet("192.0.2.30"); },
+     [] { EXPECT_EQ(TAVONetDefaultGatewaySet("192.0.2.99"), 0); }, "Gateway"},
+    {[] { return TAVOLnxSetHostname("attic"); }, [] { EXPECT_EQ(TAVOLnxSetHostname("here"), 0); }, "Name"},
+    {[] { return TAVONetSetMTUValue("eth0", 1400); }, [] { EXPECT_EQ(TAVONetSetMTUValue("eth0", 1500), 0); }, "Mtu"},
+    {[] { return SetServer("192.0.2.54"); }, [] { EXPECT_EQ(SetServer("192.0.2.53"), 0); }, "Servers"},
+    {[] { return TAVONetRouteAdd("198.51.100.0", "255.255.255.0", "eth0"); },
+     [] { ShellStatus("busybox route del -net 198.51.100.0 netmask 255.255.255.0 dev eth0 2>/dev/null"); }, "Route"},
+    {MakeBond, NoBond, "Bond", 12, NetworkChange::nothing, 2},
+    {AddIPv6Address, [] { EXPECT_TRUE((HasIPv6Address() || AddIPv6Address() == 0) && RemoveIPv6Address() == 0); },
+     "IPv6Address", 2, NetworkChange::ipv6},
+    {RemoveIPv6Address, EnsureIPv6, "IPv6AddressGone", 2, NetworkChange::ipv6},
+    {AddIPv6Route, BackFromIPv6Route, "IPv6Route", 2, NetworkChange::ipv6},
+    {RemoveIPv6Route, EnsureIPv6, "IPv6RouteGone", 2, NetworkChange::ipv6},
+    {[] { return TAVONetIPv6Set("eth0", 0); }, EnsureIPv6, "IPv6Off", 2, NetworkChange::ipv6},
+    {[] { return TAVONetIPv6Set("eth0", 1); }, [] { EXPECT_EQ(TAVONetIPv6Set("eth0", 0), 0); }, "IPv6On", 2,
+     NetworkChange::ipv6},
+};
 
 // What changes something outside of the process, or starts a program.
 bool Matters(const test::SystemCall &call)
@@ -86,8 +295,8 @@ class Death : public test::NetworkScene {
         cable_->Plug(*here_, "eth1");
         EXPECT_TRUE(here_->Run([] {
             std::filesystem::create_directories("/etc/dhcpc");
-            EXPECT_EQ(test::SetAddress("192.0.2.20"), 0);
-            EXPECT_EQ(test::SetServer("192.0.2.53"), 0);
+            EXPECT_EQ(SetAddress("192.0.2.20"), 0);
+            EXPECT_EQ(SetServer("192.0.2.53"), 0);
             EXPECT_EQ(TAVONetSetMTUValue("eth0", 1500), 0);
             return true;
         }));
@@ -113,18 +322,18 @@ class AnyChange : public Death, public testing::WithParamInterface<NetworkChange
     {
         std::optional<test::ScriptedClient> client;
         if (GetParam().needs == NetworkChange::client)
-            client.emplace(test::kQuickClient);
+            client.emplace(kQuickClient);
         EXPECT_TRUE(here_->Run([&] {
             if (GetParam().needs == NetworkChange::ipv6)
-                test::EnsureIPv6();
+                EnsureIPv6();
             GetParam().back();
             const std::string before = NetworkState();
-            EXPECT_TRUE(test::HasDefaultRoute());
+            EXPECT_TRUE(HasDefaultRoute());
             EXPECT_EQ(GetParam().make(), 0);
             const std::string asked = NetworkState();
             EXPECT_NE(asked, before);
-            EXPECT_TRUE(test::HasDefaultRoute());
-            EXPECT_NE(test::OwnAddress(), "127.0.1.1") << "there is a card with an address";
+            EXPECT_TRUE(HasDefaultRoute());
+            EXPECT_NE(OwnAddress(), "127.0.1.1") << "there is a card with an address";
             GetParam().back();
             EXPECT_EQ(NetworkState(), before);
             if (!HasFailure())
@@ -149,9 +358,9 @@ class AnyChange : public Death, public testing::WithParamInterface<NetworkChange
     static void Judge(int status, const std::string &before, const std::string &asked, const std::string &place)
     {
         EXPECT_LE(status, 2) << place;
-        EXPECT_TRUE(test::HasDefaultRoute()) << place;
+        EXPECT_TRUE(HasDefaultRoute()) << place;
         EXPECT_EQ(TAVONetHostsRefresh(), 0);
-        EXPECT_NE(test::OwnAddress(), "none") << place;
+        EXPECT_NE(OwnAddress(), "none") << place;
         const std::string found = NetworkState();
         EXPECT_TRUE(status == 2 || found == asked || (status != 0 && found == before))
             << place << " status " << status << "\n"
@@ -256,7 +465,7 @@ std::string NameOf(const testing::TestParamInfo<NetworkChange> &change)
     return change.param.name;
 }
 
-INSTANTIATE_TEST_SUITE_P(Of, AnyChange, testing::ValuesIn(test::kNetworkChanges), NameOf);
+INSTANTIATE_TEST_SUITE_P(Of, AnyChange, testing::ValuesIn(kNetworkChanges), NameOf);
 
 // To DHCP and back, whatever the server does: the box can always be reached from beyond its router.
 TEST_F(Death, IsNotWhatALeaseCosts)
@@ -296,7 +505,7 @@ printf 'IPADDR=192.0.2.40\nNETMASK=255.255.255.0\nGATEWAY=%s\n' $router >/etc/dh
                 char live[20] = "";
                 EXPECT_EQ(TAVONetDefaultGatewayGet(live, sizeof live), 0);
                 EXPECT_EQ(live, leased && works ? server.substr(6) : "192.0.2.99");
-                EXPECT_THAT(test::TextOrNone("/etc/hosts"), testing::HasSubstr(address + "\there\n"));
+                EXPECT_THAT(TextOrNone("/etc/hosts"), testing::HasSubstr(address + "\there\n"));
                 return true;
             })) << "round "
                 << round << ", " << server;

@@ -1,29 +1,19 @@
-// Bonds of the machine's two cards: made in each mode, cut off from a cable, dissolved, and interrupted at any moment.
+// Bonds of the machine's two cards: made in each mode, cut off from a cable, dissolved.
 #include "tavo_net.h"
 
 #include "machine_network.h"
+#include "network/card_record.h"
 #include "support/eventually.h"
-#include "support/rounds.h"
 
-#include <gmock/gmock.h>
+#include <gtest/gtest.h>
 
-#include <chrono>
-#include <csignal>
-#include <cstring>
 #include <filesystem>
 #include <map>
-#include <random>
-
-#include <sys/wait.h>
-#include <unistd.h>
 
 using test::Eventually;
 using test::Happen;
 using test::kScripts;
 using test::ReadFile;
-using test::Told;
-using test::WriteFile;
-using testing::HasSubstr;
 
 namespace {
 
@@ -52,11 +42,7 @@ bool HasAddress(const std::string &interface, const std::string &address)
 
 int Set(int mode, const std::vector<const char *> &members = {})
 {
-    TAVONETLINKAGGR record = {};
-    std::strcpy(record.szBond, "bond0");
-    record.nMode = mode;
-    for (const char *member : members)
-        std::strcpy(record.rgszMember[record.nMember++], member);
+    const TAVONETLINKAGGR record = test::Bond(mode, members);
     return TAVONetLinkAggrSet(&record);
 }
 
@@ -181,66 +167,6 @@ TEST_F(MachineBond, SurvivesALostCable)
     EXPECT_TRUE(Eventually([] { return BlTLIBIsConnected("bond0") == 0; }));
     Happen("restore eth0");
     Happen("restore eth1");
-}
-
-// The program that changes the bond is killed, or the power goes: what the files say then must be a network.
-TEST_F(MachineBond, ADeathAtAnyMomentLeavesANetworkThatStarts)
-{
-    std::mt19937 random(7);
-    int died = 0;
-    const int rounds = test::Rounds(80);
-    // Two minutes are enough: the emulated machine may be a slow one.
-    const auto until = std::chrono::steady_clock::now() + std::chrono::minutes(2);
-    int round = 0;
-    for (; round < rounds && std::chrono::steady_clock::now() < until; ++round) {
-        const int mode = round % 2 == 0 ? 1 + round / 2 % 3 : TAVO_NET_AGGR_NONE;
-        const pid_t child = ::fork();
-        if (child == 0)
-            ::_exit(Set(mode, mode == TAVO_NET_AGGR_NONE ? std::vector<const char *>() : kBoth) == 0 ? 0 : 1);
-        ::usleep(static_cast<useconds_t>(random() % 1200000));
-        ::kill(child, SIGKILL);
-        int status = 0;
-        ::waitpid(child, &status, 0);
-        died += WIFSIGNALED(status);
-        // A command that it ran may outlive it; the machine is switched off and on again.
-        Eventually([] { return test::Shell("pgrep -f '/etc/rc[.]network st'").status != 0; });
-        Told("/etc/rc.network stop && /etc/rc.network start");
-        const bool bonded = std::filesystem::exists("/sys/class/net/bond0");
-        const std::string card = bonded ? "bond0" : "eth0";
-        ASSERT_TRUE(HasAddress(card, "192.0.2.10")) << "round " << round << " " << card;
-        ASSERT_TRUE(Eventually([&] { return BlTLIBIsConnected(card.c_str()) == 1; })) << "round " << round;
-        EXPECT_EQ(std::filesystem::exists(kScripts + "ifcfg-bond0"), bonded) << "round " << round;
-    }
-    EXPECT_GT(died, round / 4) << "of " << round;
-    ASSERT_EQ(Set(TAVO_NET_AGGR_NONE), 0) << std::hex << TLIBErrGet();
-    EXPECT_EQ(ReadFile(kScripts + "ifcfg-eth0"), kEth0);
-    EXPECT_EQ(ReadFile(kScripts + "ifcfg-eth1"), kEth1);
-}
-
-// A document becomes the network, and a boot, which finds nothing of it in the kernel, makes the same one of the files.
-TEST_F(MachineBond, ABootAfterApplyHasTheSameNetwork)
-{
-    WriteFile("/tmp/net.json",
-              R"({"format_version": 1, "hostname": "attic", "gateway": "192.0.2.1", "dns": ["192.0.2.53"],
-        "search": ["example.com"], "cards": [
-        {"name": "bond0", "bond": "backup", "members": ["eth0", "eth1"], "address": "192.0.2.10/24",
-         "more_addresses": ["203.0.113.1/29"], "routes": ["233.252.0.0/24 via 192.0.2.4"], "mtu": 1450}]})");
-    Told("tavoctl net apply --no-probe /tmp/net.json");
-    const std::string exported = Told("tavoctl net export");
-    const std::string routes = Told("ip -4 route | sort");
-    EXPECT_THAT(routes, HasSubstr("default via 192.0.2.1 dev bond0"));
-    EXPECT_THAT(routes, HasSubstr("233.252.0.0/24 via 192.0.2.4 dev bond0"));
-
-    Told("/etc/rc.network stop; killall findhostd; for card in eth0 eth1; do ip addr flush dev $card; "
-         "ip link set $card down mtu 1500; done; modprobe -r bonding 2>/dev/null; modprobe bonding max_bonds=0 "
-         "2>/dev/null; "
-         "rm -rf /tmp/lock; mkdir /tmp/lock; [ ! -e /sys/class/net/bond0 ]");
-    Told("/etc/rc.network start");
-    EXPECT_TRUE(Eventually([] { return BlTLIBIsConnected("bond0") == 1; }));
-    EXPECT_EQ(Told("tavoctl net export"), exported);
-    EXPECT_EQ(Told("ip -4 route | sort"), routes);
-    EXPECT_THAT(Told("getent hosts $(hostname)"), HasSubstr("192.0.2.10"));
-    EXPECT_THAT(Told("tavoctl net apply --no-probe --json /tmp/net.json"), HasSubstr("\"changed\": false"));
 }
 
 }  // namespace

@@ -2,14 +2,15 @@
 #include "tavo_net.h"
 
 #include "cards.h"
+#include "network/card_record.h"
 #include "support/container_text.h"
+#include "support/own_child.h"
 
 #include <csignal>
 #include <cstdio>
 
 #include <dlfcn.h>
 #include <fcntl.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 using test::Cards;
@@ -19,7 +20,6 @@ using test::ReadFile;
 using test::WriteFile;
 using testing::ElementsAre;
 using testing::IsEmpty;
-using testing::UnorderedElementsAre;
 
 namespace {
 
@@ -69,19 +69,9 @@ class Bond : public Cards {
         tree_.Put("/sys/class/net/bonding_masters", "bond0\n");
     }
 
-    static TAVONETLINKAGGR Record(int mode, const std::vector<const char *> &members)
-    {
-        TAVONETLINKAGGR record = {};
-        std::strcpy(record.szBond, "bond0");
-        record.nMode = mode;
-        for (const char *member : members)
-            std::strcpy(record.rgszMember[record.nMember++], member);
-        return record;
-    }
-
     static int Set(int mode, const std::vector<const char *> &members = {})
     {
-        const TAVONETLINKAGGR record = Record(mode, members);
+        const TAVONETLINKAGGR record = test::Bond(mode, members);
         return TAVONetLinkAggrSet(&record);
     }
 
@@ -159,41 +149,34 @@ TEST_F(Bond, TheRemainderOfAnOldCopyIsNotRestored)
     EXPECT_EQ(Files(), kBondFiles);
 }
 
-TEST_F(Bond, RestoresAfterAFailedWrite)
+// A file cannot be written, the network does not start, or the start script dies while it stops the network.
+TEST_F(Bond, IsTakenBackWhenItCannotBeMade)
 {
-    for (int failing = 0; failing < 3; ++failing) {
-        Plain();
-        log_.Clear();
+    const auto cannot = [&](int code, const std::string &calls) {
         std::filesystem::remove(kCalls);
-        renames_to_fail = failing;
-        EXPECT_EQ(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}), -1) << failing;
-        EXPECT_EQ(renames_to_fail, -1) << failing;
-        EXPECT_EQ(LastFault(), (test::Fault{ERR_WRITE_FAILED, "net_link_aggr_set"}));
-        EXPECT_EQ(NetworkCalls(), kStopStart);
+        log_.Clear();
+        EXPECT_EQ(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}), -1);
+        EXPECT_EQ(LastFault(), (test::Fault{code, "net_link_aggr_set"}));
+        EXPECT_EQ(NetworkCalls(), calls);
         EXPECT_EQ(ReadFile(kScripts + "ifcfg-eth0"), kEth0);
         EXPECT_EQ(ReadFile(kScripts + "ifcfg-eth1"), kEth1);
         EXPECT_FALSE(std::filesystem::exists(kScripts + "ifcfg-bond0"));
+    };
+    for (int failing = 0; failing < 3; ++failing) {
+        Plain();
+        renames_to_fail = failing;
+        cannot(ERR_WRITE_FAILED, kStopStart);
+        EXPECT_EQ(renames_to_fail, -1) << failing;
         EXPECT_EQ(log_.Lines().size(), 1u);
     }
-}
-
-TEST_F(Bond, ANetworkThatDoesNotStartIsPutBack)
-{
+    Plain();
     WriteFile("/var/standin/rc.network.status", "1");
-    EXPECT_EQ(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}), -1);
-    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_link_aggr_set"}));
-    EXPECT_EQ(NetworkCalls(), std::string(kStopStart) + kStopStart) << "the old one is started";
+    cannot(ERR_OP_FAILURE, std::string(kStopStart) + kStopStart);  // the old one is started
     EXPECT_EQ(Files(), kPlainFiles);
-}
-
-// The start script dies while it stops the network.
-TEST_F(Bond, ANetworkThatIsNotStoppedIsPutBack)
-{
+    WriteFile("/var/standin/rc.network.status", "0");
     WriteFile("/var/standin/rc.network.hook",
               "#!/bin/sh\n[ $1 = start ] || [ -e /tmp/once ] || { touch /tmp/once; kill -9 $PPID; }\n", 0755);
-    EXPECT_EQ(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}), -1);
-    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "net_link_aggr_set"}));
-    EXPECT_EQ(NetworkCalls(), std::string("rc.network stop\n") + kStopStart);
+    cannot(ERR_OP_FAILURE, std::string("rc.network stop\n") + kStopStart);
     EXPECT_EQ(Files(), kPlainFiles);
 }
 
@@ -218,15 +201,12 @@ TEST_F(Bond, ADeathBetweenAnyTwoStepsLeavesANetworkThatStarts)
             if (mode == TAVO_NET_AGGR_NONE) {
                 ASSERT_EQ(Set(TAVO_NET_AGGR_ADAPTIVE, members), 0);
             }
-            const pid_t child = ::fork();
-            if (child == 0) {
+            const int result = test::InChild([&] {
                 steps_to_live = steps;
-                ::_exit(Set(mode, mode == TAVO_NET_AGGR_NONE ? std::vector<const char *>() : members) == 0 ? 0 : 1);
-            }
-            int status = 0;
-            ::waitpid(child, &status, 0);
-            died = WIFSIGNALED(status);
-            ASSERT_TRUE(died || WEXITSTATUS(status) == 0);
+                return Set(mode, mode == TAVO_NET_AGGR_NONE ? std::vector<const char *>() : members) == 0 ? 0 : 1;
+            });
+            died = result == -1;
+            ASSERT_TRUE(died || result == 0);
             const std::string when = "mode " + std::to_string(mode) + ", step " + std::to_string(steps) + "\n";
             ExpectStartable(when);
 
@@ -244,15 +224,15 @@ TEST_F(Bond, ADeathBetweenAnyTwoStepsLeavesANetworkThatStarts)
 TEST_F(Bond, RecordsThatMakeNoSenseAreRefused)
 {
     const TAVONETLINKAGGR rows[] = {
-        Record(4, {"eth0"}),         Record(-1, {"eth0"}),         Record(TAVO_NET_AGGR_LACP, {}),
-        Record(1, {"eth0", "eth0"}), Record(1, {"eth0", "bond0"}), Record(1, {"eth0", ""}),
-        Record(1, {"../../shadow"}),
+        test::Bond(4, {"eth0"}),         test::Bond(-1, {"eth0"}),         test::Bond(TAVO_NET_AGGR_LACP, {}),
+        test::Bond(1, {"eth0", "eth0"}), test::Bond(1, {"eth0", "bond0"}), test::Bond(1, {"eth0", ""}),
+        test::Bond(1, {"../../shadow"}),
     };
     for (const TAVONETLINKAGGR &row : rows) {
         EXPECT_EQ(TAVONetLinkAggrSet(&row), -1);
         EXPECT_EQ(LastFault(), (test::Fault{ERR_BAD_PARAMETERS, "net_link_aggr_set"}));
     }
-    TAVONETLINKAGGR card = Record(TAVO_NET_AGGR_BACKUP, {"eth1"});
+    TAVONETLINKAGGR card = test::Bond(TAVO_NET_AGGR_BACKUP, {"eth1"});
     std::strcpy(card.szBond, "eth0");
     EXPECT_EQ(TAVONetLinkAggrSet(&card), -1);
     EXPECT_EQ(TLIBErrGet(), ERR_LINK_AGGR_TYPE) << "the card's file would be lost";
@@ -280,12 +260,12 @@ TEST_F(Bond, IsReadFromTheKernel)
     KernelHas("balance-rr 0\n", "");
     EXPECT_EQ(TAVONetLinkAggrGet("bond0", &record), -1);
     EXPECT_EQ(TLIBErrGet(), ERR_LINK_AGGR_OPTION);
-    EXPECT_THAT(log_.Texts(), ElementsAre(testing::EndsWith(" Non-supported bonding mode [balance-rr 0]")));
+    EXPECT_EQ(log_.Take(), "net_link_aggr_get:# Non-supported bonding mode [balance-rr 0]");
 }
 
 TEST_F(Bond, MembersAreAddedOnceAndOnlyCards)
 {
-    TAVONETLINKAGGR record = Record(TAVO_NET_AGGR_LACP, {"eth0"});
+    TAVONETLINKAGGR record = test::Bond(TAVO_NET_AGGR_LACP, {"eth0"});
     EXPECT_EQ(TAVONetLinkAggrOptSlsaveAdd(&record, "eth1"), 0);
     EXPECT_EQ(TAVONetLinkAggrOptSlsaveAdd(&record, "eth1"), 0);
     EXPECT_EQ(record.nMember, 2);

@@ -11,6 +11,11 @@
 
 #include <gmock/gmock.h>
 
+#include <optional>
+#include <sstream>
+#include <string>
+#include <utility>
+
 namespace {
 
 using tavo::ExamineOutcome;
@@ -27,28 +32,23 @@ RAIDSUPERBLOCK Examine(std::string_view text)
 
 TEST(MdadmExamine, RealSuperblocks)
 {
-    const struct {
-        const char *capture, *uuid, *array;
-        int major, minor, level, members, role, events;
-    } rows[] = {
-        {"mdadm_E_0.90-mdadm-4.2", "99a1cb1e:1aaa3c52:49268cdc:b4e6580a", "/dev/md1", 0, 90, 2, 2, 0, 18},
-        {"mdadm_E_1.2-mdadm-4.2", "495e879a:4e806313:a484c744:9c844bd2", "/dev/md0", 1, 2, 2, 2, 0, 19},
-        {"mdadm_E_1.2_raid5-mdadm-4.2", "b7e9ed0e:bf1ea758:5bf5fba6:7c359649", "/dev/md5", 1, 2, 4, 3, 0, 19},
-        {"mdadm_E_0.90-mdadm-4.4", "7f3ba539:4502fd79:c7780c0e:bc15422d", "/dev/md1", 0, 90, 2, 2, 0, 1},
-        {"mdadm_E_1.1-mdadm-4.4", "ec25d9d6:a7330043:4ae7249b:66581f6c", "/dev/md0", 1, 1, 2, 2, 0, 0},
-        {"mdadm_E_1.2_raid5-mdadm-4.4", "35dd76be:fd15b260:63ed28c1:35177f1d", "/dev/md5", 1, 2, 4, 3, 0, 18},
-        {"mdadm_E_1.2_raid5_spare-mdadm-4.4", "35dd76be:fd15b260:63ed28c1:35177f1d", "/dev/md5", 1, 2, 4, 3, -1, 18},
+    // Version, UUID, array, level, members, role and events.
+    const std::pair<const char *, const char *> rows[] = {
+        {"mdadm_E_0.90-mdadm-4.2", "0.90 99a1cb1e:1aaa3c52:49268cdc:b4e6580a /dev/md1 2 2 0 18"},
+        {"mdadm_E_1.2-mdadm-4.2", "1.2 495e879a:4e806313:a484c744:9c844bd2 /dev/md0 2 2 0 19"},
+        {"mdadm_E_1.2_raid5-mdadm-4.2", "1.2 b7e9ed0e:bf1ea758:5bf5fba6:7c359649 /dev/md5 4 3 0 19"},
+        {"mdadm_E_0.90-mdadm-4.4", "0.90 7f3ba539:4502fd79:c7780c0e:bc15422d /dev/md1 2 2 0 1"},
+        {"mdadm_E_1.1-mdadm-4.4", "1.1 ec25d9d6:a7330043:4ae7249b:66581f6c /dev/md0 2 2 0 0"},
+        {"mdadm_E_1.2_raid5-mdadm-4.4", "1.2 35dd76be:fd15b260:63ed28c1:35177f1d /dev/md5 4 3 0 18"},
+        {"mdadm_E_1.2_raid5_spare-mdadm-4.4", "1.2 35dd76be:fd15b260:63ed28c1:35177f1d /dev/md5 4 3 -1 18"},
     };
-    for (const auto &row : rows) {
-        const RAIDSUPERBLOCK superblock = Examine(test::Capture(row.capture));
-        EXPECT_STREQ(superblock.szUuid, row.uuid);
-        EXPECT_STREQ(superblock.szArray, row.array);
-        EXPECT_EQ(superblock.nMajor, row.major) << row.capture;
-        EXPECT_EQ(superblock.nMinor, row.minor) << row.capture;
-        EXPECT_EQ(superblock.fLevel, row.level) << row.capture;
-        EXPECT_EQ(superblock.nMember, row.members) << row.capture;
-        EXPECT_EQ(superblock.iRole, row.role) << row.capture;
-        EXPECT_EQ(superblock.nEvent, row.events) << row.capture;
+    for (const auto &[capture, record] : rows) {
+        const RAIDSUPERBLOCK superblock = Examine(test::Capture(capture));
+        std::ostringstream text;
+        text << superblock.nMajor << "." << superblock.nMinor << " " << superblock.szUuid << " " << superblock.szArray
+             << " " << superblock.fLevel << " " << superblock.nMember << " " << superblock.iRole << " "
+             << superblock.nEvent;
+        EXPECT_EQ(text.str(), record) << capture;
     }
 }
 
@@ -60,21 +60,18 @@ TEST(MdadmExamine, Lines)
     EXPECT_EQ(Examine("Events : 0.123\n").nEvent, 123);
     EXPECT_EQ(Examine("Events : 99999999999\n").nEvent, INT32_MAX);
     EXPECT_EQ(Examine("Raid Devices : 3x\n").nMember, 0);
-    const struct {
-        const char *name, *array;
-    } names[] = {{"nas:data", ""},     {"nas:7  (local to host nas)", "/dev/md7"},
-                 {"12", "/dev/md12"},  {"nas:data (host a:3)", ""},
-                 {"nas:-1", ""},       {"nas:03", ""},
-                 {"nas:9999999", ""},  {"", ""},
-                 {"a:b:4", "/dev/md4"}};
-    for (const auto &row : names)
-        EXPECT_STREQ(Examine(std::string("Name : ") + row.name + "\n").szArray, row.array) << row.name;
-    const struct {
-        const char *name;
-        int level;
-    } levels[] = {{"raid0", 1}, {"raid1", 2}, {"raid5", 4}, {"raid6", 8}, {"raid10", 16}, {"linear", 32}, {"raid4", 4}};
-    for (const auto &row : levels)
-        EXPECT_EQ(Examine(std::string("Raid Level : ") + row.name + "\n").fLevel, row.level) << row.name;
+    const std::pair<const char *, const char *> names[] = {
+        {"nas:data", ""},     {"nas:7  (local to host nas)", "/dev/md7"},
+        {"12", "/dev/md12"},  {"nas:data (host a:3)", ""},
+        {"nas:-1", ""},       {"nas:03", ""},
+        {"nas:9999999", ""},  {"", ""},
+        {"a:b:4", "/dev/md4"}};
+    for (const auto &[name, array] : names)
+        EXPECT_STREQ(Examine(std::string("Name : ") + name + "\n").szArray, array) << name;
+    const std::pair<const char *, int> levels[] = {{"raid0", 1},   {"raid1", 2},   {"raid5", 4}, {"raid6", 8},
+                                                   {"raid10", 16}, {"linear", 32}, {"raid4", 4}};
+    for (const auto &[name, level] : levels)
+        EXPECT_EQ(Examine(std::string("Raid Level : ") + name + "\n").fLevel, level) << name;
     const struct {
         const char *line, *wrong;
         ExamineOutcome outcome;
@@ -125,18 +122,35 @@ TEST(MemberState, OfTheKernelsBits)
     EXPECT_TRUE(tavo::IsRebuildAction("recover"));
 }
 
+std::string Text(const std::optional<LVMPV> &pv)
+{
+    if (!pv)
+        return "none";
+    return std::string(pv->szPv) + "|" + pv->szVg + "|" + pv->szUuid + "|" + std::to_string(pv->nPv);
+}
+
+std::string Text(const std::optional<tavo::PvVolume> &found)
+{
+    return found ? std::string(found->device) + ":" + std::string(found->group) + ":" + std::string(found->volume)
+                 : "none";
+}
+
 TEST(LvmLines, PhysicalVolumes)
 {
-    const auto pv = tavo::ParsePvLine(test::Capture("pvs-lvm2-2.03"));
-    ASSERT_TRUE(pv);
-    EXPECT_STREQ(pv->szPv, "/dev/md0");
-    EXPECT_STREQ(pv->szVg, "/dev/vg0");
-    EXPECT_STREQ(pv->szUuid, "lSQfeY-dso4-NzXN-Hbdv-wh1J-WThm-cNRXi7");
-    EXPECT_EQ(pv->nPv, 1);
-    EXPECT_STREQ(tavo::ParsePvLine("  /dev/sdb|||0\n")->szVg, "");
-    EXPECT_STREQ(tavo::ParsePvLine("  /dev/sdb|data|u|2")->szVg, "");
-    EXPECT_EQ(tavo::ParsePvLine("  /dev/sdb|vg1|u|12|more\n")->nPv, 12);
-    EXPECT_EQ(tavo::ParsePvLine("  /dev/sdb|vg1|u|1x\n")->nPv, 0);
+    std::string_view text = test::Capture("pvs-lvm2-2.03.31");
+    const std::string_view alone = tavo::TakeLine(text);
+    const std::string_view grouped = tavo::TakeLine(text);
+    const std::pair<std::string_view, std::string> rows[] = {
+        {test::Capture("pvs-lvm2-2.03"), "/dev/md0|/dev/vg0|lSQfeY-dso4-NzXN-Hbdv-wh1J-WThm-cNRXi7|1"},
+        {alone, "/dev/md1|||0"},
+        {grouped, "/dev/md5|/dev/vg1|I5URFi-Bxlx-qBSq-PkGD-bnBP-0a8g-N821GL|1"},
+        {"  /dev/sdb|||0\n", "/dev/sdb|||0"},
+        {"  /dev/sdb|data|u|2", "/dev/sdb||u|2"},
+        {"  /dev/sdb|vg1|u|12|more\n", "/dev/sdb|/dev/vg1|u|12"},
+        {"  /dev/sdb|vg1|u|1x\n", "/dev/sdb|/dev/vg1|u|0"},
+    };
+    for (const auto &[line, record] : rows)
+        EXPECT_EQ(Text(tavo::ParsePvLine(line)), record) << line;
     for (const char *bad :
          {"", "  ", "/dev/sdb|vg1|u|1", "  WARNING: a|b|c|d", "  /dev/sdb|vg1|u", "\t /dev/sdb|v|u|1"})
         EXPECT_FALSE(tavo::ParsePvLine(bad)) << bad;
@@ -145,42 +159,20 @@ TEST(LvmLines, PhysicalVolumes)
     EXPECT_EQ(std::string(longest->szPv).size(), 127u);
     EXPECT_EQ(std::string(longest->szVg).size(), 127u);
     EXPECT_EQ(std::string(longest->szUuid).size(), 255u);
-    for (std::string_view text = test::Capture("pvs_plain-lvm2-2.03"); !text.empty();)
+    for (text = test::Capture("pvs_plain-lvm2-2.03"); !text.empty();)
         EXPECT_FALSE(tavo::ParsePvLine(tavo::TakeLine(text)));
-}
-
-TEST(LvmLines, OfTheNextRelease)
-{
-    std::string_view text = test::Capture("pvs-lvm2-2.03.31");
-    const auto alone = tavo::ParsePvLine(tavo::TakeLine(text));
-    const auto grouped = tavo::ParsePvLine(tavo::TakeLine(text));
-    ASSERT_TRUE(alone && grouped);
-    EXPECT_STREQ(alone->szPv, "/dev/md1");
-    EXPECT_STREQ(alone->szVg, "");
-    EXPECT_EQ(alone->nPv, 0);
-    EXPECT_STREQ(grouped->szPv, "/dev/md5");
-    EXPECT_STREQ(grouped->szVg, "/dev/vg1");
-    EXPECT_EQ(grouped->nPv, 1);
-    EXPECT_EQ(tavo::ParseVgLine(test::Capture("vgs-lvm2-2.03.31")), grouped->szUuid);
-    text = test::Capture("pvs_lv-lvm2-2.03.31");
-    EXPECT_FALSE(tavo::ParsePvVolumeLine(tavo::TakeLine(text))) << "in no group";
-    const auto volume = tavo::ParsePvVolumeLine(tavo::TakeLine(text));
-    ASSERT_TRUE(volume);
-    EXPECT_EQ(volume->device, "/dev/md5");
-    EXPECT_EQ(volume->group, "vg1");
-    EXPECT_EQ(volume->volume, "lv");
 }
 
 TEST(LvmLines, GroupsAndVolumes)
 {
     EXPECT_EQ(tavo::ParseVgLine(test::Capture("vgs-lvm2-2.03")), "lSQfeY-dso4-NzXN-Hbdv-wh1J-WThm-cNRXi7");
+    EXPECT_EQ(tavo::ParseVgLine(test::Capture("vgs-lvm2-2.03.31")), "I5URFi-Bxlx-qBSq-PkGD-bnBP-0a8g-N821GL");
     for (const char *bad : {"", "  \n", "UUID", "  WARNING: device is missing"})
         EXPECT_FALSE(tavo::ParseVgLine(bad)) << bad;
-    const auto volume = tavo::ParsePvVolumeLine("  /dev/md1:vg1:volume_1:");
-    ASSERT_TRUE(volume);
-    EXPECT_EQ(volume->device, "/dev/md1");
-    EXPECT_EQ(volume->group, "vg1");
-    EXPECT_EQ(volume->volume, "volume_1");
+    std::string_view text = test::Capture("pvs_lv-lvm2-2.03.31");
+    EXPECT_FALSE(tavo::ParsePvVolumeLine(tavo::TakeLine(text))) << "in no group";
+    EXPECT_EQ(Text(tavo::ParsePvVolumeLine(tavo::TakeLine(text))), "/dev/md5:vg1:lv");
+    EXPECT_EQ(Text(tavo::ParsePvVolumeLine("  /dev/md1:vg1:volume_1:")), "/dev/md1:vg1:volume_1");
     for (const char *bad : {"", "  /dev/md1:vg1", "  /dev/md1:::", "  /dev/md1:..:lv:", "  /dev/md1:vg1:a b:"})
         EXPECT_FALSE(tavo::ParsePvVolumeLine(bad)) << bad;
 }

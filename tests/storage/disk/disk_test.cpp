@@ -2,27 +2,22 @@
 #include "tavo_appliance.h"
 #include "tavo_disk.h"
 
-#include "support/captured_log.h"
-#include "support/captures.h"
-#include "support/device_tree.h"
-#include "support/fault_state.h"
-#include "support/recorded_calls.h"
-#include "support/recorded_commands.h"
+#include "storage/storage_scene.h"
 
 #include <gmock/gmock.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <climits>
-#include <cstddef>
+#include <cstdlib>
 #include <cstring>
 #include <memory>
 #include <random>
+#include <sstream>
 
 #include <fcntl.h>
 #include <linux/fs.h>
 #include <linux/hdreg.h>
-#include <sys/ioctl.h>
-#include <sys/stat.h>
 #include <syslog.h>
 #include <unistd.h>
 
@@ -30,18 +25,8 @@ using test::Fault;
 using test::LastFault;
 using testing::ElementsAre;
 using testing::IsEmpty;
-using testing::MatchesRegex;
 
 namespace {
-
-static_assert(offsetof(DISKINFO, szPath) == 16 && offsetof(DISKINFO, szModel) == 144);
-static_assert(offsetof(DISKINFO, cbDisk) == 272 && offsetof(DISKINFO, nTemperature) == 280 && sizeof(DISKINFO) == 288);
-static_assert(offsetof(TAVODISKINFO, szName) == 4 && offsetof(TAVODISKINFO, nKind) == 68);
-static_assert(offsetof(TAVODISKINFO, cMibDisk) == 72 && offsetof(TAVODISKINFO, nStatus) == 80);
-static_assert(offsetof(TavoPartitionEntry, cBlock) == 24 && offsetof(TavoPartitionEntry, szDisk) == 32 &&
-              offsetof(TavoPartitionEntry, szPath) == 288 && sizeof(TavoPartitionEntry) == 416);
-static_assert(offsetof(TavoPartitionLayout, rgEntry) == 136 && sizeof(TavoPartitionLayout) == 136 + 513 * 416);
-static_assert(sizeof(void *) != 4 || BLKGETSIZE64 == 0x80041272);
 
 constexpr uint64_t kDiskBytes = uint64_t{6} * 1000 * 1000 * 1000 * 1000 + 100;
 
@@ -64,13 +49,16 @@ test::RecordedCalls::Request Drive(uint64_t bytes = kDiskBytes, int attribute = 
     };
 }
 
-void AddDrive(test::DeviceTree &tree, const std::string &name, unsigned minor, const std::string &model)
-{
-    tree.AddDisk("/dev/" + name, 8, minor);
-    tree.Put("/sys/block/" + name + "/device/model", model + "\n");
-}
+class Disk : public test::StorageScene {
+  protected:
+    void AddDrive(const std::string &name, unsigned minor, const std::string &model)
+    {
+        tree_.AddDisk("/dev/" + name, 8, minor);
+        tree_.Put("/sys/block/" + name + "/device/model", model + "\n");
+    }
+};
 
-TEST(DiskPathParse, Table)
+TEST_F(Disk, PathParse)
 {
     const struct {
         const char *text;
@@ -80,75 +68,61 @@ TEST(DiskPathParse, Table)
         {"/dev/sdab12", {2, 2, 1, 12}}, {"/dev/sdz\n", {26, 1, 0, 0}}, {"sdba", {1, 2, 2, 0}},
         {"sda1;reboot", {1, 1, 0, 1}},
     };
-    const test::CapturedLog log;
     for (const auto &row : good) {
         DISKPATH path = {};
         EXPECT_EQ(DiskPathParse(row.text, &path), 0) << row.text;
         EXPECT_EQ(std::memcmp(&path, &row.path, sizeof path), 0) << row.text;
     }
-    EXPECT_THAT(log.Lines(), IsEmpty());
+    EXPECT_EQ(log_.Take(), "");
 
-    for (const char *bad : {"", "sd", "/dev/sd", "hda", "/dev/hda", "/dev//sda", "//dev/sda", "sda-1", "sda x", "sdabc",
-                            "sd1", "sdA", "sda99999999999"}) {
+    for (const char *bad : {"", "sd", "/dev/sd", "/dev/hda", "/dev//sda", "//dev/sda", "sda x", "sdabc", "sd1", "sdA",
+                            "sda99999999999", "hda", "sda-1"}) {
         DISKPATH path = {7, 7, 7, 7};
         EXPECT_EQ(DiskPathParse(bad, &path), -1) << bad;
         EXPECT_EQ(path.iDisk, 7) << bad;
     }
-    EXPECT_THAT(log.Texts(),
-                testing::Contains(testing::MatchesRegex("disk_path_parse:[0-9]+ bad paramters: disk path: hda")));
-    EXPECT_THAT(log.Texts(), testing::Contains(testing::MatchesRegex(
-                                 "disk_path_parse:[0-9]+ bad paramters: disk path: sda-1, ptr = -")));
+    EXPECT_THAT(log_.Take(), testing::EndsWith("disk_path_parse:# bad paramters: disk path: hda\n"
+                                               "disk_path_parse:# bad paramters: disk path: sda-1, ptr = -"));
     DISKPATH path;
     EXPECT_EQ(DiskPathParse(nullptr, &path), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "disk_path_parse"}));
 }
 
-TEST(DiskInfoGet, DescribesTheWholeDisk)
+TEST_F(Disk, InfoOfTheWholeDisk)
 {
-    test::DeviceTree tree;
-    AddDrive(tree, "sda", 0, "NASLAB-HD-0     ");
-    const test::RecordedCalls calls(Drive());
-    const test::CapturedLog log;
+    AddDrive("sda", 0, "NASLAB-HD-0     ");
+    calls_.OnIoctl(Drive());
     DISKINFO *info = nullptr;
     ASSERT_EQ(DiskInfoGet("/dev/sda3", &info), 1);
-    EXPECT_EQ(info->iDisk, 1);
-    EXPECT_EQ(info->nNameKind, DISK_NAME_PORT);
-    EXPECT_EQ(info->iUnit, 0);
-    EXPECT_EQ(info->nPartition, 3);
-    EXPECT_STREQ(info->szPath, "/dev/sda");
-    EXPECT_STREQ(info->szModel, "NASLAB-HD-0     ");
-    EXPECT_EQ(info->cbDisk, kDiskBytes - 100 % 512);
-    EXPECT_EQ(info->nTemperature, 38);
+    std::ostringstream text;
+    text << info->iDisk << " " << info->nNameKind << " " << info->iUnit << " " << info->nPartition << " "
+         << info->szPath << " [" << info->szModel << "] " << info->cbDisk << " " << info->nTemperature;
+    EXPECT_EQ(text.str(), "1 1 0 3 /dev/sda [NASLAB-HD-0     ] 6000000000000 38");
     DiskInfoFree(info);
-    EXPECT_THAT(log.Lines(), IsEmpty());
+    EXPECT_EQ(log_.Take(), "");
 }
 
-TEST(DiskInfoGet, EmptyBaysAndFailures)
+TEST_F(Disk, EmptyBaysAndFailures)
 {
-    test::DeviceTree tree;
-    tree.AddAbsent("/dev/sdb");
-    AddDrive(tree, "sdc", 32, "x");
-    test::RecordedCalls calls;
-    const test::CapturedLog log;
+    tree_.AddAbsent("/dev/sdb");
+    AddDrive("sdc", 32, "x");
     DISKINFO *info = nullptr;
     test::ForgetFault();
     EXPECT_EQ(DiskInfoGet("/dev/sdb", &info), 0);
-    EXPECT_THAT(log.Lines(), IsEmpty()) << "an empty bay is nothing to report";
+    EXPECT_EQ(log_.Take(), "") << "an empty bay is nothing to report";
     EXPECT_EQ(LastFault(), Fault{});
     EXPECT_EQ(DiskInfoGet("/dev/sdq", &info), -1);
     EXPECT_EQ(DiskInfoGet("/dev/sdc", &info), -1);
+    EXPECT_EQ(log_.Take(), "disk_info_get:# Failed to open /dev/sdq, errno=No such file or directory\n"
+                           "disk_info_get:# Failed to ioctl /dev/sdc, errno=Inappropriate ioctl for device");
     EXPECT_EQ(DiskInfoGet("rubbish", &info), -1);
     EXPECT_EQ(info, nullptr);
-    EXPECT_THAT(
-        log.Texts(),
-        testing::IsSupersetOf({testing::MatchesRegex("disk_info_get:[0-9]+ Failed to open /dev/sdq, errno=No such.*"),
-                               testing::MatchesRegex("disk_info_get:[0-9]+ Failed to ioctl /dev/sdc, errno=.*")}));
 
     uint64_t sectors = 5;
     EXPECT_EQ(DiskSizeGet("/dev/sdb", &sectors), 0);
     EXPECT_EQ(DiskSizeGet("/dev/sdq", &sectors), -1);
     EXPECT_EQ(sectors, 5u);
-    calls.OnIoctl(Drive(1535));
+    calls_.OnIoctl(Drive(1535));
     EXPECT_EQ(DiskSizeGet("/dev/sdc", &sectors), 1);
     EXPECT_EQ(sectors, 2u);
     EXPECT_EQ(DiskIsExist("/dev/sdc"), 1);
@@ -156,21 +130,19 @@ TEST(DiskInfoGet, EmptyBaysAndFailures)
     EXPECT_EQ(DiskIsExist(nullptr), -1);
 }
 
-TEST(DiskInfoEnum, BaysInOrderThenUnits)
+TEST_F(Disk, EnumHasTheBaysInOrderThenTheUnits)
 {
-    test::DeviceTree tree;
-    tree.Put("/etc.defaults/tavoinfo.conf", "maxdisks=\"4\"\nsupportebox=\"yes\"\n");
-    AddDrive(tree, "sdc", 32, "third");
-    AddDrive(tree, "sda", 0, "first");
-    tree.AddAbsent("/dev/sdb");
-    tree.Put("/sys/class/ata_device/dev4.0/class", "pmp\n");
-    tree.Put("/sys/class/ata_link/link4/sata_spd", "3.0 Gbps\n");
-    AddDrive(tree, "sdd", 48, "hidden by the unit");
-    AddDrive(tree, "sdaa", 64, "unit, first");
-    AddDrive(tree, "sdac", 80, "unit, third");
-    AddDrive(tree, "sde", 96, "beyond the bays");
-    const test::RecordedCalls calls(Drive());
-    const test::CapturedLog log;
+    Model("maxdisks=\"4\"\nsupportebox=\"yes\"\n");
+    AddDrive("sdc", 32, "third");
+    AddDrive("sda", 0, "first");
+    tree_.AddAbsent("/dev/sdb");
+    tree_.Put("/sys/class/ata_device/dev4.0/class", "pmp\n");
+    tree_.Put("/sys/class/ata_link/link4/sata_spd", "3.0 Gbps\n");
+    AddDrive("sdd", 48, "hidden by the unit");
+    AddDrive("sdaa", 64, "unit, first");
+    AddDrive("sdac", 80, "unit, third");
+    AddDrive("sde", 96, "beyond the bays");
+    calls_.OnIoctl(Drive());
     const auto enumerate = [](const int *filter) {
         std::vector<std::string> found;
         DISKLIST *list = nullptr;
@@ -189,20 +161,19 @@ TEST(DiskInfoEnum, BaysInOrderThenUnits)
     EXPECT_THAT(enumerate(&internal), ElementsAre("/dev/sda first", "/dev/sdc third"));
     EXPECT_EQ(enumerate(&units).size(), 2u);
     EXPECT_EQ(enumerate(&none).size(), 4u);
-    EXPECT_THAT(log.Lines(), IsEmpty()) << "neither a missing node nor an empty bay is worth a line";
+    EXPECT_EQ(log_.Take(), "") << "neither a missing node nor an empty bay is worth a line";
     EXPECT_EQ(LastFault(), Fault{});
 
-    tree.Put("/sys/class/ata_link/link4/sata_spd", "<unknown>\n");
+    tree_.Put("/sys/class/ata_link/link4/sata_spd", "<unknown>\n");
     EXPECT_THAT(enumerate(&units), IsEmpty()) << "switched off";
-    tree.Remove("/sys/class");
+    tree_.Remove("/sys/class");
     DISKLIST *list = nullptr;
     EXPECT_EQ(DiskInfoEnum(nullptr, &list), -1);
     EXPECT_EQ(list, nullptr);
-    EXPECT_THAT(log.Texts(),
-                ElementsAre(testing::MatchesRegex("disk_info_enum:[0-9]+ Failed to enum ebox, errno=0x900")));
+    EXPECT_EQ(log_.Take(), "disk_info_enum:# Failed to enum ebox, errno=0x900");
 }
 
-TEST(Model, BaysAndLimits)
+TEST_F(Disk, BaysAndLimitsOfTheModel)
 {
     const struct {
         const char *settings;
@@ -218,65 +189,56 @@ TEST(Model, BaysAndLimits)
         {"raidsizelimit=4294967296\n", 4, sizeof(long) == 4 ? ULONG_MAX : uint64_t{1} << 32},
     };
     for (const auto &row : rows) {
-        test::DeviceTree tree;
-        tree.Put("/etc.defaults/tavoinfo.conf", row.settings);
+        Model(row.settings);
         EXPECT_EQ(TAVOMaxDiskGet(), row.bays) << row.settings;
         EXPECT_EQ(RAIDSizeLimitGet(), row.limit) << row.settings;
         EXPECT_EQ(TAVOEBoxDevIs(0), 0);
     }
 }
 
-TEST(TAVODiskEnum, IdeFirstWholeDisksOnly)
+TEST_F(Disk, KernelNumbersIdeFirstWholeDisksOnly)
 {
-    test::DeviceTree tree;
-    const test::RecordedCalls calls(Drive(uint64_t{98304} << 10));
-    tree.Put("/proc/partitions", std::string(test::Capture("proc_partitions-linux-6.1-armmp-lpae")) +
-                                     "   3       64      100 hdb\n   3       65      100 hdb1\n  65       16  1 sdr\n"
-                                     " 259        0      100 sdzz\n   8      256      100 sdzy\n");
+    calls_.OnIoctl(Drive(uint64_t{98304} << 10));
+    tree_.Put("/proc/partitions", std::string(test::Capture("proc_partitions-linux-6.1-armmp-lpae")) +
+                                      "   3       64      100 hdb\n   3       65      100 hdb1\n  65       16  1 sdr\n"
+                                      " 259        0      100 sdzz\n   8      256      100 sdzy\n");
     int32_t *numbers = nullptr;
     ASSERT_EQ(TAVODiskEnum(1, &numbers), 8);
     EXPECT_THAT(std::vector<int32_t>(numbers, numbers + 8),
                 ElementsAre(832, 2048, 2064, 2080, 2096, 2112, 2128, 16656));
     std::free(numbers);
 
-    tree.AddDisk("/dev/sdb", 8, 16);
+    tree_.AddDisk("/dev/sdb", 8, 16);
     TAVODISKINFO *info = nullptr;
     ASSERT_EQ(TAVODiskGetInfo(1, 2064, &info), 0);
-    EXPECT_EQ(info->nDevice, 2064);
-    EXPECT_STREQ(info->szName, "sdb");
-    EXPECT_EQ(info->nKind, 7);
-    EXPECT_EQ(info->cMibDisk, 96u);
-    EXPECT_EQ(info->nStatus, 0);
+    std::ostringstream text;
+    text << info->nDevice << " " << info->szName << " " << info->nKind << " " << info->cMibDisk << " " << info->nStatus;
+    EXPECT_EQ(text.str(), "2064 sdb 7 96 0");
     std::free(info);
 
     const struct {
-        int kind;
-        int number;
-        int code;
-    } refusals[] = {
-        {2, 2064, ERR_BAD_PARAMETERS},
-        {1, 2065, ERR_NO_DISK_ID},  // a partition
-        {1, 9999, ERR_NO_DISK_ID},
-        {1, 2080, ERR_DISK_IO_FAILED},  // no node
-    };
+        int kind, number, code;
+    } refusals[] = {{2, 2064, ERR_BAD_PARAMETERS},
+                    {1, 2065, ERR_NO_DISK_ID},  // a partition
+                    {1, 9999, ERR_NO_DISK_ID},
+                    {1, 2080, ERR_DISK_IO_FAILED}};  // no node
     for (const auto &row : refusals) {
         info = nullptr;
         EXPECT_EQ(TAVODiskGetInfo(row.kind, row.number, &info), -1);
         EXPECT_EQ(LastFault(), (Fault{row.code, "disk_get_info"})) << row.number;
         EXPECT_EQ(info, nullptr);
     }
-    tree.Put("/proc/partitions", "major minor  #blocks  name\n\n");
+    tree_.Put("/proc/partitions", "major minor  #blocks  name\n\n");
     EXPECT_EQ(TAVODiskEnum(1, &numbers), 0);
     EXPECT_EQ(numbers, nullptr);
-    tree.Remove("/proc/partitions");
+    tree_.Remove("/proc/partitions");
     EXPECT_EQ(TAVODiskEnum(1, &numbers), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "disk_enum"}));
 }
 
-TEST(DiskContainerGet, Table)
+TEST_F(Disk, ContainerGet)
 {
-    test::DeviceTree tree;
-    tree.Put("/etc.defaults/tavoinfo.conf", "esatadiskname=\"sdy\"\n");
+    Model("esatadiskname=\"sdy\"\n");
     const struct {
         const char *path;
         int kind;  // 0: refused
@@ -286,14 +248,13 @@ TEST(DiskContainerGet, Table)
         {"hda", 0},        {"sd1", 0}, {"sda-", 0},     {"/dev/md0", 0},
     };
     for (const auto &row : rows) {
-        const test::CapturedLog log;
         int kind = 0;
         EXPECT_EQ(DiskContainerGet(row.path, &kind), row.kind ? 0 : -1) << row.path;
         EXPECT_EQ(kind, row.kind) << row.path;
-        EXPECT_EQ(std::any_of(log.Lines().begin(), log.Lines().end(),
-                              [](const auto &line) { return line.priority == LOG_ERR; }),
-                  row.kind == 0)
-            << row.path;
+        const bool complains = std::any_of(log_.Lines().begin(), log_.Lines().end(),
+                                           [](const auto &line) { return line.priority == LOG_ERR; });
+        EXPECT_EQ(complains, row.kind == 0) << row.path;
+        log_.Clear();
     }
 }
 
@@ -316,30 +277,25 @@ TEST(TAVODiskPartitionNumGet, Table)
     }
 }
 
-TEST(Model, OfADrive)
+TEST_F(Disk, ModelOfADrive)
 {
-    test::DeviceTree tree;
-    AddDrive(tree, "sda", 0, "NASLAB-HD-0     ");
-    tree.AddDisk("/dev/sdb", 8, 16);
-    const test::CapturedLog log;
+    AddDrive("sda", 0, "NASLAB-HD-0     ");
+    tree_.AddDisk("/dev/sdb", 8, 16);
     char model[128];
     EXPECT_EQ(TAVOLnxDiskGetModel("/dev/sda", model, sizeof model), 0);
     EXPECT_STREQ(model, "NASLAB-HD-0     ");
-    char small[7];
-    EXPECT_EQ(TAVOLnxDiskGetModel("/dev/sda", small, sizeof small), 0);
-    EXPECT_STREQ(small, "NASLAB");
-    EXPECT_THAT(log.Lines(), IsEmpty());
+    EXPECT_EQ(TAVOLnxDiskGetModel("/dev/sda", model, 7), 0);
+    EXPECT_STREQ(model, "NASLAB");
+    EXPECT_EQ(log_.Take(), "");
     EXPECT_EQ(TAVOLnxDiskGetModel("/dev/sdb", model, sizeof model), -1);
     EXPECT_EQ(TAVOLnxDiskGetModel("/dev/sdz", model, sizeof model), -1);
-    EXPECT_THAT(
-        log.Texts(),
-        ElementsAre(
-            testing::MatchesRegex("lnx_disk_get_model \\([0-9]+\\) Failed to open /sys/block/sdb/device/model"),
-            testing::MatchesRegex("lnx_disk_get_model\\([0-9]+\\) Failed to open /dev/sdz. 2 \\(No such file.*")));
+    EXPECT_EQ(log_.Take(), "lnx_disk_get_model (#) Failed to open /sys/block/sdb/device/model\n"
+                           "lnx_disk_get_model(#) Failed to open /dev/sdz. 2 (No such file or directory)");
 }
 
-TEST(TAVODiskIsMvSocDriver, FollowsTheLink)
+TEST_F(Disk, IsMvSocDriverFollowsTheLink)
 {
+    const char *const pci = "../../devices/pci0000:00/0000:00:01.0/host0/target0:0:0/0:0:0:0";
     const struct {
         const char *link;
         const char *id;  // of the controller; NULL for no such file
@@ -347,27 +303,26 @@ TEST(TAVODiskIsMvSocDriver, FollowsTheLink)
     } rows[] = {
         {"../../../0:0:0:0", nullptr, 0},
         {"../../devices/platform/host3/target3:0:0/3:0:0:0", nullptr, 1},
-        {"../../devices/pci0000:00/0000:00:01.0/host0/target0:0:0/0:0:0:0", "0x7042\n", 1},
-        {"../../devices/pci0000:00/0000:00:01.0/host0/target0:0:0/0:0:0:0", "0x6145\n", 1},
-        {"../../devices/pci0000:00/0000:00:01.0/host0/target0:0:0/0:0:0:0", "0x7042", 0},
-        {"../../devices/pci0000:00/0000:00:01.0/host0/target0:0:0/0:0:0:0", "0x8086\n", 0},
-        {"../../devices/pci0000:00/0000:00:01.0/host0/target0:0:0/0:0:0:0", nullptr, -1},
+        {pci, "0x7042\n", 1},
+        {pci, "0x6145\n", 1},
+        {pci, "0x7042", 0},
+        {pci, "0x8086\n", 0},
+        {pci, nullptr, -1},
         {nullptr, nullptr, -1},
     };
+    tree_.Put("/sys/block/sda/size", "1\n");
     for (const auto &row : rows) {
-        test::DeviceTree tree;
-        const test::CapturedLog log;
-        tree.Put("/sys/block/sda/size", "1\n");
+        tree_.Remove("/sys/block/sda/device");
+        tree_.Remove("/sys/devices");
         if (row.link)
-            tree.Link("/sys/block/sda/device", row.link);
+            tree_.Link("/sys/block/sda/device", row.link);
         if (row.id)
-            tree.Put("/sys/devices/pci0000:00/0000:00:01.0/device", row.id);
+            tree_.Put("/sys/devices/pci0000:00/0000:00:01.0/device", row.id);
         EXPECT_EQ(TAVODiskIsMvSocDriver("/dev/sda"), row.result) << (row.link ? row.link : "");
-        if (row.result < 0)
-            EXPECT_THAT(log.Texts(),
-                        ElementsAre(MatchesRegex("readlink\\(\\) from /sys/block/sda/.+ failed\\. \\(.+\\)")));
-        else
-            EXPECT_THAT(log.Texts(), IsEmpty());
+        const auto failed = testing::MatchesRegex("readlink\\(\\) from /sys/block/sda/.+ failed\\. \\(.+\\)");
+        EXPECT_THAT(log_.Texts(), testing::Each(failed));
+        EXPECT_EQ(log_.Lines().size(), row.result < 0 ? 1u : 0u);
+        log_.Clear();
     }
 }
 
@@ -400,13 +355,12 @@ TEST(DiskDDStatusGet, Table)
     ::unlink("/tmp/tavodd.sdq");
 }
 
-TEST(TAVODiskGetDevnameFromFd, AsksTheKernel)
+TEST_F(Disk, NameOfADescriptorIsTheKernels)
 {
-    test::DeviceTree tree;
-    tree.AddDisk("/dev/sda", 8, 3);
-    tree.AddDisk("/dev/sdb", 104, 0);
-    tree.Link("/sys/dev/block/8:3", "../../devices/pci0000:00/ata1/host0/block/sda/sda3");
-    tree.Link("/sys/dev/block/104:0", "../../devices/pci0000:00/block/cciss!c0d0");
+    tree_.AddDisk("/dev/sda", 8, 3);
+    tree_.AddDisk("/dev/sdb", 104, 0);
+    tree_.Link("/sys/dev/block/8:3", "../../devices/pci0000:00/ata1/host0/block/sda/sda3");
+    tree_.Link("/sys/dev/block/104:0", "../../devices/pci0000:00/block/cciss!c0d0");
     const auto name_of = [](const char *path) {
         const int fd = ::open(path, O_RDONLY | O_CLOEXEC);
         char *const name = TAVODiskGetDevnameFromFd(fd);
@@ -423,13 +377,10 @@ TEST(TAVODiskGetDevnameFromFd, AsksTheKernel)
     EXPECT_EQ(LastFault(), (Fault{ERR_STAT_FAILED, "disk_get_devname_from_fd"}));
 }
 
-class Layout : public testing::Test {
+class Layout : public test::StorageScene {
   protected:
     Layout() { std::memset(layout_.get(), 0x5A, sizeof *layout_); }
 
-    test::DeviceTree tree_;
-    test::RecordedCommands commands_;
-    test::CapturedLog log_;
     std::unique_ptr<TavoPartitionLayout> layout_ = std::make_unique<TavoPartitionLayout>();
 };
 
@@ -439,19 +390,18 @@ TEST_F(Layout, TakesTheRowsOfItsDiskAlone)
               "major minor  #blocks  name\n\n   8  0  98304 sda\n   8  3  76800 sda3\n 259 7 5 sda512\n"
               "   8  9  1 sda513\n   8 9 1 sda0\n   8 9 1 sda03\n  65 9 1 sdaa\n  65 9 1 sdab1\n   8 9 1 xsda2\n");
     ASSERT_EQ(DiskPartitionsLayoutGet("sda", layout_.get()), 0);
-    EXPECT_EQ(layout_->nEntry, 3);
     EXPECT_EQ(layout_->nKind, DISK_LAYOUT_PLAIN);
     EXPECT_STREQ(layout_->szDisk, "sda");
-    EXPECT_EQ(layout_->rgEntry[0].nKind, DISK_ENTRY_DISK);
-    EXPECT_EQ(layout_->rgEntry[0].cBlock, 98304);
-    EXPECT_STREQ(layout_->rgEntry[0].szPath, "/dev/sda");
-    EXPECT_EQ(layout_->rgEntry[3].nKind, DISK_ENTRY_PARTITION);
-    EXPECT_STREQ(layout_->rgEntry[3].szDisk, "sda");
-    EXPECT_STREQ(layout_->rgEntry[3].szName, "sda3");
-    EXPECT_STREQ(layout_->rgEntry[3].szPath, "/dev/sda3");
-    EXPECT_EQ(layout_->rgEntry[512].nMajor, 259);
-    EXPECT_EQ(layout_->rgEntry[512].nMinor, 7);
-    EXPECT_EQ(layout_->rgEntry[511].iEntry, 511);
+    std::ostringstream text;
+    text << layout_->nEntry;
+    for (const int i : {0, 3, 511, 512}) {
+        const TavoPartitionEntry &entry = layout_->rgEntry[i];
+        text << "\n"
+             << entry.iEntry << " " << entry.nKind << " " << entry.nMajor << ":" << entry.nMinor << " " << entry.cBlock
+             << " [" << entry.szDisk << "] [" << entry.szName << "] [" << entry.szPath << "]";
+    }
+    EXPECT_EQ(text.str(), "3\n0 1 8:0 98304 [sda] [sda] [/dev/sda]\n3 2 8:3 76800 [sda] [sda3] [/dev/sda3]\n"
+                          "511 0 0:0 0 [] [] []\n0 2 259:7 5 [sda] [sda512] [/dev/sda512]");
     int used = 0;
     for (const TavoPartitionEntry &entry : layout_->rgEntry)
         used += entry.nKind != DISK_ENTRY_UNUSED;
@@ -463,9 +413,8 @@ TEST_F(Layout, TakesTheRowsOfItsDiskAlone)
     EXPECT_EQ(layout_->nKind, DISK_LAYOUT_UNSET);
     tree_.Remove("/proc/partitions");
     EXPECT_EQ(DiskPartitionsLayoutGet("sda", layout_.get()), -1);
-    EXPECT_THAT(log_.Texts(),
-                testing::Contains(testing::MatchesRegex(
-                    "disk_partitions_layout_get:[0-9]+ Failed to read line of /proc/partitions, errno=0x900")));
+    EXPECT_THAT(log_.Take(), testing::HasSubstr("disk_partitions_layout_get:# Failed to read line of /proc/partitions, "
+                                                "errno=0x900"));
     EXPECT_EQ(DiskPartitionsLayoutGet("s", layout_.get()), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "disk_partitions_layout_get"}));
 }
@@ -473,19 +422,17 @@ TEST_F(Layout, TakesTheRowsOfItsDiskAlone)
 TEST_F(Layout, KnowsSystemDisksAndSpecialDevices)
 {
     tree_.Put("/proc/partitions", "   8  16  98304 sdb\n   8  17  1 sdb1\n");
-    tree_.Put("/etc.defaults/tavoinfo.conf", "supportraid=\"yes\"\n");
-    commands_.OnCommand([](const std::string &command) -> test::CommandReply {
-        if (command == "/sbin/sfdisk -l -uS -N1 /dev/sdb")
-            return {0, "/dev/sdb1 256 4980735 4980480 fd Linux raid autodetect\n"};
-        return {0, "/dev/sdb2 4980736 9175039 4194304 fd Linux raid autodetect\n"};
-    });
+    Model("supportraid=\"yes\"\n");
+    const std::string first = "/sbin/sfdisk -l -uS -N1 /dev/sdb";
+    const std::string second = "/sbin/sfdisk -l -uS -N2 /dev/sdb";
+    commands_.Print({{first, "/dev/sdb1 256 4980735 4980480 fd Linux raid autodetect\n"},
+                     {second, "/dev/sdb2 4980736 9175039 4194304 fd Linux raid autodetect\n"}});
     ASSERT_EQ(DiskPartitionsLayoutGet("sdb", layout_.get()), 0);
     EXPECT_EQ(layout_->nKind, DISK_LAYOUT_SYSTEM);
     EXPECT_EQ(layout_->rgEntry[3].nKind, DISK_ENTRY_DATA);
-    EXPECT_THAT(commands_.Commands(),
-                ElementsAre("/sbin/sfdisk -l -uS -N1 /dev/sdb", "/sbin/sfdisk -l -uS -N2 /dev/sdb"));
+    EXPECT_THAT(commands_.Take(), ElementsAre(first, second));
 
-    commands_.OnCommand([](const std::string &) -> test::CommandReply { return {1, ""}; });
+    commands_.Exit(1);
     const std::string usb = "/sys/devices/pci0000:00/usb1/1-1/";
     tree_.Put(usb + "1-1:1.0/host6/target6:0:0/6:0:0:0/model", "x\n");
     tree_.Put(usb + "idVendor", "05ac\n");
@@ -522,11 +469,8 @@ TEST_F(Layout, StaysWithinItsBlock)
         tree_.Put("/proc/partitions", text);
         std::memset(fenced.get(), 0xA5, sizeof *fenced);
         ASSERT_EQ(DiskPartitionsLayoutGet("sda", &fenced->layout), 0);
-        const auto is_fence = [](unsigned char byte) {
-            return byte == 0xA5;
-        };
-        ASSERT_TRUE(std::all_of(std::begin(fenced->before), std::end(fenced->before), is_fence)) << text;
-        ASSERT_TRUE(std::all_of(std::begin(fenced->after), std::end(fenced->after), is_fence)) << text;
+        for (const auto &fence : {fenced->before, fenced->after})
+            ASSERT_EQ(std::count(fence, fence + sizeof fenced->before, 0xA5), 4096) << text;
     }
 }
 

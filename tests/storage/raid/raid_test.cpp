@@ -96,10 +96,10 @@ class Raid : public test::StorageScene {
         for (int i = 0; i < static_cast<int>(states.size()); ++i) {
             disks.push_back({i == 0 ? 0 : i + 1, 8, 16 * i + 3, states[static_cast<size_t>(i)]});
             const std::string device = "sd" + std::string(1, static_cast<char>('a' + i)) + "3";
-            if (!linked_)
-                tree_.Link("/sys/dev/block/8:" + std::to_string(16 * i + 3), "../../devices/x/block/" + device);
+            const std::string link = "/sys/dev/block/8:" + std::to_string(16 * i + 3);
+            tree_.Remove(link);
+            tree_.Link(link, "../../devices/x/block/" + device);
         }
-        linked_ = true;
         tree_.Put("/dev/md5", "");
         tree_.Put("/sys/block/md5/size", "303104\n");
         tree_.Put("/sys/block/md5/md/component_size", "75776\n");
@@ -136,7 +136,6 @@ class Raid : public test::StorageScene {
     }
 
     const std::string superblock_{test::Capture("mdadm_E_1.2_raid5-mdadm-4.2")};
-    bool linked_ = false;
 };
 
 TEST_F(Raid, StatusDecide)
