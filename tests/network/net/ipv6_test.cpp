@@ -11,7 +11,6 @@
 
 #include <linux/ethtool.h>
 #include <linux/sockios.h>
-#include <unistd.h>
 
 using test::Cards;
 using test::LastFault;
