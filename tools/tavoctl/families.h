@@ -2,9 +2,10 @@
 #ifndef TAVOCTL_FAMILIES_H
 #define TAVOCTL_FAMILIES_H
 
+#include "frame/program.h"
+
 namespace tavoctl {
 
-class Program;
 using AddFamily = void(Program &);
 
 AddFamily AddConf;

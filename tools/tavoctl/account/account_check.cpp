@@ -3,15 +3,13 @@
 
 #include "tavo_bdb.h"
 
-#include "account/account_key.h"
-#include "frame/failure.h"
+#include "account/account_rules.h"
 #include "frame/private_copy.h"
-#include "frame/terminal_text.h"
+#include "frame/text.h"
 
 #include <cstdio>
 #include <cstdlib>
 #include <fstream>
-#include <optional>
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -128,8 +126,7 @@ void AccountCheck::ReadFile(std::size_t index)
     std::ifstream in(file.path);
     if (!in && IsAway(file.path))
         return Add("", file.path, "the file is missing");
-    if (!in)
-        throw LibraryFailure(std::string("read ") + file.path);
+    Must(in.is_open(), std::string("read ") + file.path);
     int number = 0;
     for (std::string line; std::getline(in, line);) {
         ++number;

@@ -5,8 +5,6 @@
 #include "frame/verb.h"
 
 #include <map>
-#include <string>
-#include <vector>
 
 namespace tavoctl {
 

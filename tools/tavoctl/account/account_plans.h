@@ -8,12 +8,6 @@
 #include "frame/password.h"
 #include "frame/verb.h"
 
-#include <functional>
-#include <optional>
-#include <string>
-#include <utility>
-#include <vector>
-
 namespace tavoctl {
 
 struct GivenHashes {

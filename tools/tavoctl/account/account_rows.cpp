@@ -2,7 +2,6 @@
 #include "account/account_rows.h"
 
 #include "account/account_verbs.h"
-#include "frame/failure.h"
 
 #include <nlohmann/json.hpp>
 

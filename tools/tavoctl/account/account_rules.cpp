@@ -1,8 +1,9 @@
 // tavoctl's own rules for accounts, beyond those of the library.
 #include "account/account_rules.h"
 
+#include "tavo_str.h"
+
 #include "account/user_record.h"
-#include "frame/failure.h"
 
 #include <algorithm>
 #include <cstdio>
@@ -80,6 +81,15 @@ EntryFailures DeleteAll(const std::vector<std::string> &names, int (*remove)(con
                 [&] { return !is_there(name); });
     }
     return failures;
+}
+
+std::string AccountKey(const std::string &name)
+{
+    constexpr std::size_t growth = 6;  // bytes that one may become in upper case
+    std::string key(name.size() * growth + 1, '\0');
+    if (TLIBUnicodeUTF8StrUpper(name.c_str(), key.data(), static_cast<int>(key.size())) < 0)
+        return name;
+    return key.c_str();
 }
 
 }  // namespace tavoctl

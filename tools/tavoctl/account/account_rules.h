@@ -50,6 +50,9 @@ void RefuseTooMany(int additions, const std::string &attempted);
 EntryFailures DeleteAll(const std::vector<std::string> &names, int (*remove)(const char *const *, int),
                         bool (*is_there)(const std::string &), const std::string &noun);
 
+// The key under which a name is stored: the name in upper case, or unchanged when it cannot be converted.
+std::string AccountKey(const std::string &name);
+
 }  // namespace tavoctl
 
 #endif

@@ -3,16 +3,15 @@
 
 #include "account/account_check.h"
 #include "account/account_rules.h"
-#include "frame/folder_names.h"
+#include "frame/files.h"
 #include "frame/processes.h"
+#include "frame/text.h"
 
 #include <cerrno>
-#include <charconv>
 #include <csignal>
 #include <cstring>
 #include <fstream>
 #include <sstream>
-#include <vector>
 
 #include <strings.h>
 #include <utmpx.h>
@@ -58,12 +57,9 @@ bool RunsAs(pid_t pid, uid_t uid)
 std::vector<pid_t> ProcessesOf(uid_t uid)
 {
     std::vector<pid_t> found;
-    for (const std::string &name : FolderNames("/proc")) {
-        pid_t pid = 0;
-        const auto [stop, error] = std::from_chars(name.data(), name.data() + name.size(), pid);
-        if (error == std::errc() && stop == name.data() + name.size() && RunsAs(pid, uid) && !CommandLine(pid).empty())
-            found.push_back(pid);
-    }
+    for (const std::string &name : FolderNames("/proc"))
+        if (const auto pid = NumberIn<pid_t>(name); pid && RunsAs(*pid, uid) && !CommandLine(*pid).empty())
+            found.push_back(*pid);
     return found;
 }
 

@@ -2,18 +2,13 @@
 #ifndef TAVOCTL_ACCOUNT_VERBS_H
 #define TAVOCTL_ACCOUNT_VERBS_H
 
-#include "account/account_key.h"
 #include "account/account_rows.h"
 #include "account/account_rules.h"
-#include "frame/failure.h"
-#include "frame/input_file.h"
-#include "frame/terminal_text.h"
+#include "frame/files.h"
+#include "frame/text.h"
 #include "frame/verb.h"
 
-#include <charconv>
 #include <set>
-#include <string>
-#include <vector>
 
 namespace tavoctl {
 
@@ -23,8 +18,8 @@ Action AccountList(Arguments &in)
     const auto prefix = in.Option("--prefix", "TEXT", any_text, "only names that begin so, in any case");
     const auto part = in.Option("--part", "TEXT", any_text, "only names that hold this, in any case");
     return [=](Call &call) {
-        if (*prefix && *part)
-            throw UsageFailure(std::string("list the ") + Kind::noun + "s", "--prefix and --part exclude each other");
+        RefuseIf(*prefix && *part, std::string("list the ") + Kind::noun + "s",
+                 "--prefix and --part exclude each other");
         call.List(Kind::columns, Kind::All(prefix->value_or(""), part->value_or("")));
     };
 }
@@ -39,8 +34,8 @@ Action AccountRename(Arguments &in)
     return [=](Call &call) {
         const std::string attempted = std::string("rename the ") + Kind::noun + " " + *name + " to " + *new_name;
         const auto before = Kind::Read(*name);
-        if (Kind::IsSystem(before) && !*system && Kind::guards_names)
-            throw UsageFailure(attempted, "the system needs it", "--system does it anyway");
+        RefuseIf(Kind::IsSystem(before) && !*system && Kind::guards_names, attempted, "the system needs it",
+                 "--system does it anyway");
         auto after = before;
         after.name = *new_name;
         call.Change(std::string(Kind::noun) + " " + before.name, "name", before.name, after.name);
@@ -62,8 +57,7 @@ Action AccountDelete(Arguments &in)
         for (const std::string &name : *names) {
             const auto record = Kind::Read(name);
             const std::string attempted = std::string("delete the ") + Kind::noun + " " + name;
-            if (Kind::IsSystem(record) && !*system)
-                throw UsageFailure(attempted, "the system needs it", "--system does it anyway");
+            RefuseIf(Kind::IsSystem(record) && !*system, attempted, "the system needs it", "--system does it anyway");
             Kind::RefuseDelete(record, attempted);
             if (!*force)
                 Kind::RefuseUsed(record, attempted);
@@ -74,9 +68,7 @@ Action AccountDelete(Arguments &in)
         }
         if (!call.Proceed("Delete " + Joined(doomed, ", ") + Kind::delete_warning + "?"))
             return;
-        const auto is_there = [](const std::string &name) {
-            return Kind::Find(name).has_value();
-        };
+        const auto is_there = [](const std::string &name) { return Kind::Find(name).has_value(); };
         for (const auto &[name, failure] : DeleteAll(doomed, Kind::remove, is_there, Kind::noun))
             call.FailEntry(std::string(Kind::noun) + " " + name, failure);
     };
@@ -101,8 +93,7 @@ class ImportedRows {
             throw Failure{.attempted = Attempted(row),
                           .reason = std::string("allowed: ") + Kind::new_kind.allowed,
                           .code = Kind::new_kind.code};
-        if (!names_.insert(AccountKey(name)).second)
-            throw UsageFailure(Attempted(row), "duplicate name");
+        RefuseIf(!names_.insert(AccountKey(name)).second, Attempted(row), "duplicate name");
         const auto old = Kind::Find(name);
         if (old && !update_)
             throw Failure{.attempted = Attempted(row), .hint = "--update changes it", .code = Kind::exists_code};
@@ -115,10 +106,8 @@ class ImportedRows {
         const std::string *text = row.Find(column);
         if (!text || text->empty())
             return {};
-        int id = -1;
-        const auto [stop, error] = std::from_chars(text->data(), text->data() + text->size(), id);
-        if (error != std::errc() || stop != text->data() + text->size() || id < 0)
-            throw UsageFailure("read the list", row.Where() + ": " + column + " " + *text + " is not an id");
+        const auto id = NumberIn<int>(*text);
+        RefuseIf(!id || *id < 0, "read the list", row.Where() + ": " + column + " " + *text + " is not an id");
         return id;
     }
 
@@ -126,8 +115,8 @@ class ImportedRows {
     void TakeId(const AccountRow &row, int id)
     {
         Kind::RefuseId(*row.Find("name"), id);
-        if (!ids_.insert(id).second)
-            throw UsageFailure(Attempted(row), std::string("duplicate ") + Kind::noun + " id " + std::to_string(id));
+        RefuseIf(!ids_.insert(id).second, Attempted(row),
+                 std::string("duplicate ") + Kind::noun + " id " + std::to_string(id));
     }
 
   private:

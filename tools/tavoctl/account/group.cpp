@@ -10,8 +10,7 @@
 #include "account/user_record.h"
 #include "families.h"
 #include "frame/held_locks.h"
-#include "frame/program.h"
-#include "frame/progress.h"
+#include "frame/terminal.h"
 
 #include <algorithm>
 #include <fstream>
@@ -81,9 +80,7 @@ bool SameName(const std::string &a, const std::string &b)
 Action GroupShow(Arguments &in)
 {
     const auto name = in.Text("NAME", group_kind, GroupKind::name_help);
-    return [=](Call &call) {
-        call.One(group_columns, GroupKind::WithMembers(ReadGroup(*name)));
-    };
+    return [=](Call &call) { call.One(group_columns, GroupKind::WithMembers(ReadGroup(*name))); };
 }
 
 Action GroupAdd(Arguments &in)
@@ -123,12 +120,11 @@ Action GroupModify(Arguments &in)
     const auto gid = in.Number("--gid", "N", "group id");
     return [=](Call &call) {
         const std::string attempted = "change the group " + *name;
-        if (!*members && !*join && !*leave && !*description && !*gid)
-            throw UsageFailure(attempted, "nothing to change was given");
+        RefuseIf(!*members && !*join && !*leave && !*description && !*gid, attempted, "nothing to change was given");
         const Group before = ReadGroup(*name);
         Group group = before;
-        if ((*members || *join || *leave) && SameName(group.name, "users"))
-            throw UsageFailure("change the members of " + *name, "every user is one");
+        RefuseIf((*members || *join || *leave) && SameName(group.name, "users"), "change the members of " + *name,
+                 "every user is one");
         if (*members)
             group.members = ExistingUsers(**members);
         for (const std::string &user : ExistingUsers(join->value_or("")))
@@ -257,63 +253,59 @@ std::vector<Group> AllGroups()
 void AddGroup(Program &program)
 {
     Family &group = program.Add("group", "Local groups");
-    group.Add("list", reads, Answer::List(group_columns), R"(Lists the groups of people, and "users", to which everybody
+    group.Add("list", reads, Answer::List(group_columns), AccountList<GroupKind>,
+              R"(Lists the groups of people, and "users", to which everybody
 belongs. Groups of the system are not listed.
 
 tavoctl group list
-tavoctl group list --part dev --json)",
-              AccountList<GroupKind>);
-    group.Add("show", reads, Answer::One(group_columns), R"(Shows a group. Listed as members are those that are users;
+tavoctl group list --part dev --json)");
+    group.Add("show", reads, Answer::One(group_columns), GroupShow,
+              R"(Shows a group. Listed as members are those that are users;
 names that the group file has beyond these are strangers.
 
 tavoctl group show staff
-tavoctl group show users --json)",
-              GroupShow);
-    group.Add("add", changes, Answer::Change(), R"(Adds a group. An id is chosen unless one is given.
+tavoctl group show users --json)");
+    group.Add("add", changes, GroupAdd, R"(Adds a group. An id is chosen unless one is given.
 
 tavoctl group add staff
-tavoctl group add staff --members anna,berta --description "Everybody here")",
-              GroupAdd);
-    group.Add("modify", changes, Answer::Change(), R"(Changes the members, the description or the id of a group; what is
+tavoctl group add staff --members anna,berta --description "Everybody here")");
+    group.Add("modify", changes, GroupModify, R"(Changes the members, the description or the id of a group; what is
 not given stays.
 
 tavoctl group modify staff --join carla --leave anna,berta
 tavoctl group modify staff --members anna
-tavoctl group modify staff --description "")",
-              GroupModify);
-    group.Add("rename", changes, Answer::Change(), R"(Renames a group, also in the lists of shared folders
+tavoctl group modify staff --description "")");
+    group.Add("rename", changes, AccountRename<GroupKind>, R"(Renames a group, also in the lists of shared folders
 and of Samba.
 
-tavoctl group rename staff team)",
-              AccountRename<GroupKind>);
-    group.Add("delete", changes | destroys, Answer::Batch(), R"(Deletes groups, also from the lists of shared folders,
+tavoctl group rename staff team)");
+    group.Add("delete", changes | destroys, Answer::Batch(), AccountDelete<GroupKind>,
+              R"(Deletes groups, also from the lists of shared folders,
 all in one batch. Their members stay. Nothing is done when one of them is not there, or is the primary group of a user.
 
 tavoctl group delete staff
-tavoctl group delete --yes staff guests)",
-              AccountDelete<GroupKind>);
-    group.Add("import", changes, Answer::Batch(),
+tavoctl group delete --yes staff guests)");
+    group.Add("import", changes, Answer::Batch(), GroupImport,
               R"(Adds the groups of a list, and with --update changes those that are
 there. The list is comma-separated values under a line of field names (name, gid, description, members), or the JSON of
 export. Only name is required. Everything is looked at before anything is changed; then it goes group by group. One that
 fails does not keep the others from being done.
 
 tavoctl group import --dry-run groups.csv
-tavoctl group import --update groups.json)",
-              GroupImport);
-    group.Add("export", reads, Answer::Document(group_export_columns), R"(Writes the groups of people as comma-separated
+tavoctl group import --update groups.json)");
+    group.Add("export", reads, Answer::Document(group_export_columns), GroupExport,
+              R"(Writes the groups of people as comma-separated
 values, or as JSON, in the form that import reads. Members are joined by commas in one field.
 
 tavoctl group export > groups.csv
-tavoctl group export --json)",
-              GroupExport);
-    group.Add("check", reads, Answer::List(finding_columns), R"(Compares the two files of groups with the library's
+tavoctl group export --json)");
+    group.Add("check", reads, Answer::List(finding_columns), GroupCheck,
+              R"(Compares the two files of groups with the library's
 stores, and names every difference, and every member that is not a user; exit status 1 when there is one. Nothing is
 changed. A file that was edited by hand differs until the library is used the next time, and then the file counts.
 
 tavoctl group check
-tavoctl group check --json)",
-              GroupCheck);
+tavoctl group check --json)");
 }
 
 }  // namespace tavoctl

@@ -5,7 +5,7 @@
 
 #include "frame/containers.h"
 #include "frame/failure.h"
-#include "frame/suggestion.h"
+#include "frame/text.h"
 
 #include <algorithm>
 #include <sstream>
@@ -72,8 +72,7 @@ std::vector<std::string> GroupNames(const std::string &prefix, const std::string
     constexpr int all = TAVO_GROUP_LOCAL | TAVO_GROUP_DOMAIN;
     const int count = part.empty() ? TAVOGroupEnumByPrefix(names.Address(), all, prefix.c_str())
                                    : TAVOGroupEnumBySubstr(names.Address(), all, part.c_str());
-    if (count < 0)
-        throw LibraryFailure("list the groups");
+    Must(count >= 0, "list the groups");
     return names.Items();
 }
 
@@ -85,8 +84,7 @@ std::vector<std::string> GroupNames()
 std::vector<std::string> GroupMembers(const std::string &name)
 {
     StringList members;
-    if (TAVOGroupListMember(name.c_str(), members.Address()) < 0)
-        throw LibraryFailure("list the members of " + name);
+    Must(TAVOGroupListMember(name.c_str(), members.Address()) >= 0, "list the members of " + name);
     return members.Items();
 }
 
@@ -109,8 +107,7 @@ void SetGroup(const std::optional<std::string> &old_name, const Group &group, co
     record.szName = const_cast<char *>(group.name.c_str());
     record.nGid = group.gid;
     record.rgszMember = members.data();
-    if (TAVOGroupSet(old_name ? old_name->c_str() : nullptr, &record) != 0)
-        throw LibraryFailure(attempted);
+    Must(TAVOGroupSet(old_name ? old_name->c_str() : nullptr, &record) == 0, attempted);
     if (ReadGroup(group.name).description != group.description &&
         TAVOGroupDescSet(group.name.c_str(), group.description.c_str()) != 0)
         throw LibraryFailure("set the description of the group " + group.name);

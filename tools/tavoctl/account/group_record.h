@@ -2,7 +2,7 @@
 #ifndef TAVOCTL_GROUP_RECORD_H
 #define TAVOCTL_GROUP_RECORD_H
 
-#include "frame/argument_kind.h"
+#include "frame/arguments.h"
 #include "frame/column.h"
 
 #include <optional>

@@ -4,25 +4,16 @@
 #include "tavo_user.h"
 
 #include "account/account_check.h"
-#include "account/account_key.h"
-#include "frame/failure.h"
+#include "account/account_rules.h"
+#include "frame/text.h"
 
-#include <charconv>
 #include <fstream>
-#include <vector>
 
 namespace tavoctl {
 namespace {
 
 enum ShadowField : unsigned char { least_field = 3, most_field, warning_field, shadow_fields = 9 };
 enum SambaField : unsigned char { flags_field = 4, samba_fields = 7 };
-
-std::optional<int> DaysIn(const std::string &field)
-{
-    int days = 0;
-    const auto [stop, error] = std::from_chars(field.data(), field.data() + field.size(), days);
-    return error == std::errc() && stop == field.data() + field.size() ? std::optional(days) : std::nullopt;
-}
 
 }  // namespace
 
@@ -45,8 +36,9 @@ AgesByKey ReadPasswordAges()
     for (std::string line; std::getline(in, line);) {
         const std::vector<std::string> fields = SplitFields(line);
         if (fields.size() == shadow_fields)
-            ages.emplace(AccountKey(fields[0]), PasswordAges{DaysIn(fields[least_field]), DaysIn(fields[most_field]),
-                                                             DaysIn(fields[warning_field])});
+            ages.emplace(AccountKey(fields[0]),
+                         PasswordAges{NumberIn<int>(fields[least_field]), NumberIn<int>(fields[most_field]),
+                                      NumberIn<int>(fields[warning_field])});
     }
     return ages;
 }

@@ -5,10 +5,7 @@
 
 #include "account/user_record.h"
 #include "families.h"
-#include "frame/failure.h"
-#include "frame/program.h"
-#include "frame/progress.h"
-#include "storage/mounted_volumes.h"
+#include "frame/terminal.h"
 
 #include <cmath>
 #include <cstdlib>
@@ -50,7 +47,8 @@ UserQuota ReadQuota(const std::string &user, const MountedVolume &volume)
 }
 
 // on and off.
-Action QuotaSwitch(Arguments &in, bool on)
+template <bool on>
+Action QuotaSwitch(Arguments &in)
 {
     const auto volume = in.Number("VOLUME", "VOLUME", volume_help, 1, most_volumes);
     return [=](Call &call) {
@@ -89,22 +87,13 @@ Action QuotaGet(Arguments &in)
 {
     const auto user = in.Text("USER", user_kind, user_help);
     const auto number = in.Number("VOLUME", "VOLUME", volume_help, 1, most_volumes);
-    return [=](Call &call) {
-        call.One(quota_columns, ReadQuota(*user, FindVolume(static_cast<int>(**number))));
-    };
+    return [=](Call &call) { call.One(quota_columns, ReadQuota(*user, FindVolume(static_cast<int>(**number)))); };
 }
 
 Action QuotaReport(Arguments &in)
 {
     const auto number = in.OptionalText("VOLUME", volume_kind, volume_help);
-    return [=](Call &call) {
-        std::vector<UserQuota> quotas;
-        for (const MountedVolume &volume : *number ? std::vector{FindVolume(**number)} : MountedVolumes())
-            if (*number || HasQuotas(volume))
-                for (const UserQuota &quota : QuotasOn(volume))
-                    quotas.push_back(quota);
-        call.List(quota_columns, quotas);
-    };
+    return [=](Call &call) { call.List(quota_columns, *number ? QuotasOn(FindVolume(**number)) : AllQuotas()); };
 }
 
 }  // namespace
@@ -128,12 +117,21 @@ bool HasQuotas(const MountedVolume &volume)
 std::vector<UserQuota> QuotasOn(const MountedVolume &volume)
 {
     std::vector<UserQuota> quotas;
-    for (const std::string &user : UserNames()) {
+    for (const std::string &user : UserNames())
         if (const auto quota = QuotaOf(user, volume))
             quotas.push_back(*quota);
         else if (TLIBErrGet() != ERR_NO_SUCH_USER)  // deleted since
             throw LibraryFailure("read the limit of " + user + " on " + volume.path);
-    }
+    return quotas;
+}
+
+std::vector<UserQuota> AllQuotas()
+{
+    std::vector<UserQuota> quotas;
+    for (const MountedVolume &volume : MountedVolumes())
+        if (HasQuotas(volume))
+            for (const UserQuota &quota : QuotasOn(volume))
+                quotas.push_back(quota);
     return quotas;
 }
 
@@ -153,36 +151,31 @@ void SetLimit(const std::string &user, const MountedVolume &volume, float megaby
 void AddQuota(Program &program)
 {
     Family &quota = program.Add("quota", "Limits on the space of users");
-    quota.Add("on", changes, Answer::Change(), R"(Switches quotas on: remounts the volume with them, counts what every
+    quota.Add("on", changes, QuotaSwitch<true>, R"(Switches quotas on: remounts the volume with them, counts what every
 user has there, and has the kernel enforce the limits. It takes a while on a full volume, and nobody may write to it
 meanwhile.
 
-tavoctl quota on 1)",
-              [](Arguments &in) { return QuotaSwitch(in, true); });
-    quota.Add("off", changes, Answer::Change(), R"(Switches quotas off. The limits stay for the next time.
+tavoctl quota on 1)");
+    quota.Add("off", changes, QuotaSwitch<false>, R"(Switches quotas off. The limits stay for the next time.
 
-tavoctl quota off 1)",
-              [](Arguments &in) { return QuotaSwitch(in, false); });
-    quota.Add("set", changes, Answer::Change(),
-              R"(Limits the space of a user on a volume; "none" takes the limit away. A
+tavoctl quota off 1)");
+    quota.Add("set", changes, QuotaSet, R"(Limits the space of a user on a volume; "none" takes the limit away. A
 number without a unit counts megabytes.
 
 tavoctl quota set anna 1 20G
 tavoctl quota set anna 1 1536K
-tavoctl quota set anna 1 none)",
-              QuotaSet);
-    quota.Add("get", reads, Answer::One(quota_columns), R"(Shows the limit and the use of one user on a volume.
+tavoctl quota set anna 1 none)");
+    quota.Add("get", reads, Answer::One(quota_columns), QuotaGet,
+              R"(Shows the limit and the use of one user on a volume.
 
 tavoctl quota get anna 1
-tavoctl quota get anna 1 --json)",
-              QuotaGet);
-    quota.Add("report", reads, Answer::List(quota_columns),
+tavoctl quota get anna 1 --json)");
+    quota.Add("report", reads, Answer::List(quota_columns), QuotaReport,
               R"(Lists limit and use of every user on every volume that has
 quotas switched on, or on one.
 
 tavoctl quota report
-tavoctl quota report 1 --json)",
-              QuotaReport);
+tavoctl quota report 1 --json)");
 }
 
 }  // namespace tavoctl

@@ -31,6 +31,7 @@ inline constexpr Column<UserQuota> quota_columns[] = {
 std::optional<UserQuota> QuotaOf(const std::string &user, const MountedVolume &volume);
 bool HasQuotas(const MountedVolume &volume);  // whether they are switched on
 std::vector<UserQuota> QuotasOn(const MountedVolume &volume);
+std::vector<UserQuota> AllQuotas();  // of every volume that has them switched on
 
 // Throw a Failure. 0 megabytes: no limit.
 void SwitchQuotasOn(const MountedVolume &volume);

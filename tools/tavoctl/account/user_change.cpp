@@ -1,7 +1,6 @@
 // tavoctl user: the verbs that change single accounts.
 #include "account/account_rules.h"
 #include "account/user_verbs.h"
-#include "frame/failure.h"
 #include "frame/password.h"
 
 namespace tavoctl {
@@ -101,8 +100,7 @@ Action UserModify(Arguments &in)
     const auto name = in.Text("NAME", user_kind, user_help);
     const UserFacts facts(in);
     return [=](Call &call) {
-        if (!facts.Any())
-            throw UsageFailure("change the user " + *name, "nothing to change was given");
+        RefuseIf(!facts.Any(), "change the user " + *name, "nothing to change was given");
         ChangeUser(call, *name, "change the user " + *name, [&](User &user) { facts.Apply(user); });
     };
 }
@@ -118,8 +116,7 @@ Action UserPasswd(Arguments &in)
         if (!call.Proceed())
             return;
         const std::string password = choice.For(*name);
-        if (user.password == password && !password.empty())
-            throw UsageFailure(attempted, "this is the hash of the one that is set");
+        RefuseIf(user.password == password && !password.empty(), attempted, "this is the hash of the one that is set");
         user.password = password;
         SetUser({.old_name = *name, .user = user}, attempted);
     };

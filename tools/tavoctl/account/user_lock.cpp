@@ -1,7 +1,6 @@
 // tavoctl user: who gets in, and how long a password is valid.
 #include "account/password_ages.h"
 #include "account/user_verbs.h"
-#include "frame/failure.h"
 
 namespace tavoctl {
 namespace {
@@ -12,12 +11,15 @@ std::string StateAfter(const User &user, bool locked, const std::string &attempt
     if (locked)
         return "locked";
     const std::size_t hash = user.password.find_first_not_of('!');
-    if (hash == std::string::npos || user.password[hash] == '*')
-        throw UsageFailure(attempted, "there is no password to go back to", "tavoctl user passwd sets one");
+    RefuseIf(hash == std::string::npos || user.password[hash] == '*', attempted, "there is no password to go back to",
+             "tavoctl user passwd sets one");
     return PasswordState(user.password.substr(hash));
 }
 
-Action SetLock(Arguments &in, bool locked)
+}  // namespace
+
+template <bool locked>
+Action UserLock(Arguments &in)
 {
     const auto names = in.Texts("NAME", user_kind, user_help);
     const auto system = in.Flag("--system", "also a user that the system needs");
@@ -27,8 +29,7 @@ Action SetLock(Arguments &in, bool locked)
         };
         for (const std::string &name : *names) {
             const User user = ReadUser(name);
-            if (IsSystemUser(user) && !*system)
-                throw UsageFailure(attempted(name), "the system needs it", "--system does it anyway");
+            RefuseIf(IsSystemUser(user) && !*system, attempted(name), "the system needs it", "--system does it anyway");
             const std::string samba = SambaState(user.name);
             call.BeginEntry("user " + user.name);
             call.Change("user " + user.name, "password", PasswordState(user.password),
@@ -43,17 +44,8 @@ Action SetLock(Arguments &in, bool locked)
     };
 }
 
-}  // namespace
-
-Action UserLock(Arguments &in)
-{
-    return SetLock(in, true);
-}
-
-Action UserUnlock(Arguments &in)
-{
-    return SetLock(in, false);
-}
+template Action UserLock<true>(Arguments &in);
+template Action UserLock<false>(Arguments &in);
 
 Action UserAging(Arguments &in)
 {
@@ -65,10 +57,9 @@ Action UserAging(Arguments &in)
     return [=](Call &call) {
         const std::string attempted = "set the age of the password of " + *name;
         const User user = ReadUser(*name);
-        if (!*least && !*most && !*warning)
-            throw UsageFailure(attempted, "nothing to change was given");
-        if (user.cannot_change_password && (*least || *most))
-            throw UsageFailure(attempted, "this password is fixed", "tavoctl user modify --cannot-change-password no");
+        RefuseIf(!*least && !*most && !*warning, attempted, "nothing to change was given");
+        RefuseIf(user.cannot_change_password && (*least || *most), attempted, "this password is fixed",
+                 "tavoctl user modify --cannot-change-password no");
         const PasswordAges before = AgesOf(user.name);
         const auto change = [&](const char *column, std::optional<int> old, const std::optional<int64_t> &days) {
             if (days)
@@ -77,15 +68,13 @@ Action UserAging(Arguments &in)
         change("min_days", before.least, *least);
         change("max_days", before.most, *most);
         change("warn_days", before.warning, *warning);
-        if (!user.cannot_change_password &&
-            most->value_or(before.most.value_or(most_days)) <= least->value_or(before.least.value_or(0)))
-            throw UsageFailure(attempted, "the password could never be changed",
-                               "--max must be above --min; tavoctl user modify --cannot-change-password yes fixes it");
+        RefuseIf(!user.cannot_change_password &&
+                     most->value_or(before.most.value_or(most_days)) <= least->value_or(before.least.value_or(0)),
+                 attempted, "the password could never be changed",
+                 "--max must be above --min; tavoctl user modify --cannot-change-password yes fixes it");
         if (!call.Proceed())
             return;
-        const auto days = [](const std::optional<int64_t> &given) {
-            return static_cast<int>(given.value_or(-1));
-        };
+        const auto days = [](const std::optional<int64_t> &given) { return static_cast<int>(given.value_or(-1)); };
         Must(TAVOUserAgingSet(name->c_str(), days(*least), days(*most), days(*warning)) == 0, attempted);
     };
 }

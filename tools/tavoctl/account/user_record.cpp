@@ -3,14 +3,12 @@
 
 #include "tavo_group.h"
 
-#include "account/account_rules.h"
 #include "frame/containers.h"
 #include "frame/error_codes.h"
 #include "frame/failure.h"
-#include "frame/suggestion.h"
+#include "frame/text.h"
 
 #include <algorithm>
-#include <charconv>
 #include <cstdio>
 #include <ctime>
 
@@ -122,8 +120,7 @@ std::vector<std::string> UserNames(const std::string &prefix, const std::string 
     constexpr int all = TAVO_USER_LOCAL | TAVO_USER_DOMAIN;
     const int count = part.empty() ? TAVOUserEnumByPrefix(names.Address(), all, prefix.c_str())
                                    : TAVOUserEnumBySubstr(names.Address(), all, part.c_str());
-    if (count < 0)
-        throw LibraryFailure("list the users");
+    Must(count >= 0, "list the users");
     return names.Items();
 }
 
@@ -201,11 +198,8 @@ std::optional<int> ExpiryOf(const std::string &text)
 
 std::optional<int> PrivilegeOf(const std::string &text)
 {
-    const bool hexadecimal = ::strncasecmp(text.c_str(), "0x", 2) == 0;
-    const char *end = text.c_str() + text.size();
-    int mask = 0;
-    const auto [stop, error] = std::from_chars(text.c_str() + (hexadecimal ? 2 : 0), end, mask, hexadecimal ? 16 : 10);
-    return error == std::errc() && stop == end && mask >= 0 ? std::optional(mask) : std::nullopt;
+    const auto mask = AnyNumberIn<int>(text);
+    return mask && *mask >= 0 ? mask : std::nullopt;
 }
 
 }  // namespace

@@ -6,7 +6,7 @@
 
 #include "account/account_rules.h"
 #include "account/password_ages.h"
-#include "frame/argument_kind.h"
+#include "frame/arguments.h"
 #include "frame/column.h"
 
 #include <optional>
@@ -90,10 +90,7 @@ inline constexpr Column<User> user_columns[] = {
      in_details},
     {"cannot_change_password", field<&User::cannot_change_password>, "", in_details},
     {"expires", [](const User &u) { return ExpiryText(u.expires); }, "the last day, yyyy-mm-dd; null: never"},
-    {"expired",
-     [](const User &u) {
-         return TAVOUserIsExpired(u.expires) == 1;
-     }},
+    {"expired", [](const User &u) { return TAVOUserIsExpired(u.expires) == 1; }},
     {"min_days", [](const User &u) { return AgesOf(u.name).least; }, "before the password may be changed again",
      in_one},
     {"max_days", [](const User &u) { return AgesOf(u.name).most; }, "after which it must be changed", in_one},

@@ -1,4 +1,5 @@
 // tavoctl user: many accounts at once, from and to files.
+#include "account/account_check.h"
 #include "account/account_plans.h"
 #include "account/user_verbs.h"
 #include "frame/password.h"
@@ -6,7 +7,6 @@
 #include <algorithm>
 #include <fstream>
 #include <map>
-#include <sstream>
 
 namespace tavoctl {
 namespace {
@@ -20,13 +20,9 @@ std::map<std::string, SambaHashes> ReadSambaHashes()
 {
     std::map<std::string, SambaHashes> found;
     std::ifstream in("/usr/tavo/etc/private/smbpasswd");
-    for (std::string line; std::getline(in, line);) {
-        std::istringstream fields(line);
-        std::string name, uid, lm, nt;
-        if (std::getline(fields, name, ':') && std::getline(fields, uid, ':') && std::getline(fields, lm, ':') &&
-            std::getline(fields, nt, ':') && lm.find('X') == std::string::npos)
-            found[AccountKey(name)] = {lm, nt};
-    }
+    for (std::string line; std::getline(in, line);)
+        if (const auto fields = SplitFields(line); fields.size() > 3 && fields[2].find('X') == std::string::npos)
+            found[AccountKey(fields[0])] = {fields[2], fields[3]};
     return found;
 }
 
@@ -53,8 +49,7 @@ void ApplyRow(const AccountRow &row, User &user)
     if (const std::string *date = given("expires"))
         user.expires = ParseExpiry(*date);
     if (const std::string *flag = given("cannot_change_password")) {
-        if (*flag != "yes" && *flag != "no")
-            throw UsageFailure("take " + *flag + " as cannot_change_password", "allowed: yes, no");
+        RefuseIf(*flag != "yes" && *flag != "no", "take " + *flag + " as cannot_change_password", "allowed: yes, no");
         user.cannot_change_password = *flag == "yes";
     }
 }
@@ -72,10 +67,9 @@ bool ChoosePassword(const AccountRow &row, const PasswordChoice *choice, const s
     const GivenHashes given = {change.user.name, value("password_hash"), value("lm_hash"), value("nt_hash")};
     const std::string password = value("password");
     const bool hashed = !given.password.empty() && !given.lm.empty() && !given.nt.empty();
-    if (!hashed && !(given.password + given.lm + given.nt).empty())
-        throw UsageFailure(attempted, "of the three hashes some are missing");
-    if (hashed && !password.empty())
-        throw UsageFailure(attempted, "it has a password and hashes of one");
+    RefuseIf(!hashed && !(given.password + given.lm + given.nt).empty(), attempted,
+             "of the three hashes some are missing");
+    RefuseIf(hashed && !password.empty(), attempted, "it has a password and hashes of one");
     bool differs = hashed && change.user.password != given.password;
     if (!password.empty())
         change.user.password = password;
@@ -117,9 +111,7 @@ void StoreHashes(const std::vector<GivenHashes> &hashes, const std::string &atte
     Must(!count || TAVOUserSetPasswd(rows.data(), password.data(), lm.data(), nt.data(), count) == 0, attempted);
     for (std::size_t i = 0; i < hashes.size(); ++i) {
         const GivenHashes &hash = hashes[i];
-        const auto is_stored = [&] {
-            return ReadUser(hash.name).password == hash.password;
-        };
+        const auto is_stored = [&] { return ReadUser(hash.name).password == hash.password; };
         const std::size_t before = failures.size();
         if (!is_stored())
             TryAgain(
@@ -197,7 +189,7 @@ void ThrowFirst(const EntryFailures &failures)
         return;
     Failure failure = failures.front().second;
     if (failures.size() > 1)
-        failure.hint += (failure.hint.empty() ? "" : "; ") + std::to_string(failures.size()) + " entries were refused";
+        failure.AddHint(std::to_string(failures.size()) + " entries were refused");
     throw failure;
 }
 
@@ -235,9 +227,7 @@ Action UserExport(Arguments &in)
 {
     const auto hashes = in.Flag("--hashes", "with the hashes of the passwords");
     const auto path = in.Option("--output", "PATH", file_path, "a new file that only root can read (standard output)");
-    return [=](Call &call) {
-        Export(call, ExportedUsers(LocalUsers(), *hashes), *path);
-    };
+    return [=](Call &call) { Export(call, ExportedUsers(LocalUsers(), *hashes), *path); };
 }
 
 Action UserImport(Arguments &in)

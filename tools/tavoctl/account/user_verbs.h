@@ -42,34 +42,16 @@ struct ExportedUser {
 };
 
 inline constexpr Column<ExportedUser> user_export_columns[] = {
-    {"name",
-     [](const ExportedUser &e) {
-         return e.user.name;
-     }},
+    {"name", [](const ExportedUser &e) { return e.user.name; }},
     {"uid", [](const ExportedUser &e) { return Id(e.user.uid); }, "user id"},
     {"gid", [](const ExportedUser &e) { return Id(e.user.gid); }, "id of the primary group"},
-    {"description",
-     [](const ExportedUser &e) {
-         return e.user.description;
-     }},
-    {"home",
-     [](const ExportedUser &e) {
-         return e.user.home;
-     }},
-    {"shell",
-     [](const ExportedUser &e) {
-         return e.user.shell;
-     }},
-    {"mail",
-     [](const ExportedUser &e) {
-         return e.user.mail;
-     }},
+    {"description", [](const ExportedUser &e) { return e.user.description; }},
+    {"home", [](const ExportedUser &e) { return e.user.home; }},
+    {"shell", [](const ExportedUser &e) { return e.user.shell; }},
+    {"mail", [](const ExportedUser &e) { return e.user.mail; }},
     {"privilege", [](const ExportedUser &e) { return PrivilegeText(e.user.privilege); }, "a mask, hexadecimal"},
     {"expires", [](const ExportedUser &e) { return ExpiryText(e.user.expires); }, "the last day, yyyy-mm-dd"},
-    {"cannot_change_password",
-     [](const ExportedUser &e) {
-         return e.user.cannot_change_password;
-     }},
+    {"cannot_change_password", [](const ExportedUser &e) { return e.user.cannot_change_password; }},
     {"password_hash", field<&ExportedUser::hash>, "with --hashes", in_one},
     {"lm_hash", field<&ExportedUser::lm>, "of Samba, with --hashes", in_one},
     {"nt_hash", field<&ExportedUser::nt>, "of Samba, with --hashes", in_one},
@@ -79,8 +61,8 @@ Action UserAdd(Arguments &in);
 Action UserModify(Arguments &in);
 Action UserPasswd(Arguments &in);
 Action UserExpire(Arguments &in);
+template <bool locked>
 Action UserLock(Arguments &in);
-Action UserUnlock(Arguments &in);
 Action UserAging(Arguments &in);
 Action UserImport(Arguments &in);
 Action UserExport(Arguments &in);

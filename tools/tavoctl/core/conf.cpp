@@ -2,12 +2,8 @@
 #include "tavo_file.h"
 
 #include "families.h"
-#include "frame/failure.h"
-#include "frame/program.h"
 #include "frame/settings_file.h"
-#include "frame/suggestion.h"
-
-#include <algorithm>
+#include "frame/text.h"
 
 namespace tavoctl {
 namespace {
@@ -128,39 +124,42 @@ void AddConf(Program &program)
 {
     constexpr unsigned changes_file = changes | by_anybody;
     Family &conf = program.Add("conf", "Settings files: lines of key and value");
-    conf.Add("get", reads, Answer::One(conf_value), R"(Prints the value of KEY; of a repeated key, the first.
+    conf.Add("get", reads, Answer::One(conf_value), ConfGet, R"(Prints the value of KEY; of a repeated key, the first.
 
 tavoctl conf get runsamba
 tavoctl conf get --defaults maxdisks
-tavoctl conf get --file /etc/sysconfig/network HOSTNAME)",
-             ConfGet);
-    conf.Add("set", changes_file, Answer::Change(), R"(Sets KEY to VALUE. Its first line is replaced, later ones of the
+tavoctl conf get --file /etc/sysconfig/network HOSTNAME)");
+    conf.Add(
+        "set", changes_file, [](Arguments &in) { return GiveValue(in, TLIBFileSetKeyValue, "set"); },
+        R"(Sets KEY to VALUE. Its first line is replaced, later ones of the
 same key are dropped, and a key that is not there is appended; comments and order stay.
 
 tavoctl conf set runsamba yes
 tavoctl conf set --dry-run runsamba yes
 tavoctl conf set --file /etc/sysconfig/network --quote HOSTNAME nas
-tavoctl conf set offset -- -5)",
-             [](Arguments &in) { return GiveValue(in, TLIBFileSetKeyValue, "set"); });
-    conf.Add("list", reads, Answer::List(conf_lines), R"(Lists every setting with the number of its line. A repeated key
+tavoctl conf set offset -- -5)");
+    conf.Add("list", reads, Answer::List(conf_lines), ConfList,
+             R"(Lists every setting with the number of its line. A repeated key
 is listed as often as the file has it; `conf get` takes the first.
 
 tavoctl conf list
-tavoctl conf list --defaults --json)",
-             ConfList);
-    conf.Add("remove", changes_file, Answer::Change(), R"(Removes every line of KEY.
+tavoctl conf list --defaults --json)");
+    conf.Add(
+        "remove", changes_file, [](Arguments &in) { return TakeAway(in, TLIBFileRemoveKey, "remove"); },
+        R"(Removes every line of KEY.
 
 tavoctl conf remove userHomeEnable
-tavoctl conf remove --dry-run userHomeEnable)",
-             [](Arguments &in) { return TakeAway(in, TLIBFileRemoveKey, "remove"); });
-    conf.Add("append", changes_file, Answer::Change(), R"(Appends KEY with VALUE. Fails when the key is there already.
+tavoctl conf remove --dry-run userHomeEnable)");
+    conf.Add(
+        "append", changes_file, [](Arguments &in) { return GiveValue(in, TLIBFileAppendKey, "append"); },
+        R"(Appends KEY with VALUE. Fails when the key is there already.
 
-tavoctl conf append userHomeEnable yes)",
-             [](Arguments &in) { return GiveValue(in, TLIBFileAppendKey, "append"); });
-    conf.Add("comment", changes_file, Answer::Change(), R"(Turns every line of KEY into a comment, with ";" in front.
+tavoctl conf append userHomeEnable yes)");
+    conf.Add(
+        "comment", changes_file, [](Arguments &in) { return TakeAway(in, TLIBFileComment, "comment out"); },
+        R"(Turns every line of KEY into a comment, with ";" in front.
 
-tavoctl conf comment userHomeEnable)",
-             [](Arguments &in) { return TakeAway(in, TLIBFileComment, "comment out"); });
+tavoctl conf comment userHomeEnable)");
 }
 
 }  // namespace tavoctl

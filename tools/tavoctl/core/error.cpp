@@ -3,36 +3,23 @@
 
 #include "families.h"
 #include "frame/error_codes.h"
-#include "frame/failure.h"
-#include "frame/program.h"
-#include "frame/suggestion.h"
-
-#include <charconv>
+#include "frame/text.h"
 
 namespace tavoctl {
 namespace {
 
 constexpr Column<ErrorCode> error_columns[] = {
     {"code", [](const ErrorCode &row) { return Hexadecimal(row.code); }, "hexadecimal"},
-    {"name",
-     [](const ErrorCode &row) {
-         return std::string(row.name);
-     }},
-    {"meaning",
-     [](const ErrorCode &row) {
-         return std::string(row.meaning);
-     }},
+    {"name", [](const ErrorCode &row) { return std::string(row.name); }},
+    {"meaning", [](const ErrorCode &row) { return std::string(row.meaning); }},
     {"hint", [](const ErrorCode &row) { return Maybe(row.hint); }, "what usually helps", in_details},
 };
 
 // A number as people write codes: 8192 or 0x2000, but not 2000h.
 const ErrorCode *Understood(const std::string &text)
 {
-    const bool hexadecimal = text.starts_with("0x") || text.starts_with("0X");
-    const char *end = text.data() + text.size();
-    int code = 0;
-    const auto [stop, error] = std::from_chars(text.data() + (hexadecimal ? 2 : 0), end, code, hexadecimal ? 16 : 10);
-    return error == std::errc{} && stop == end ? FindErrorCode(code) : FindErrorCode(text);
+    const auto code = AnyNumberIn<int>(text);
+    return code ? FindErrorCode(*code) : FindErrorCode(text);
 }
 
 std::vector<std::string> ErrorNames()
@@ -47,9 +34,8 @@ constexpr ArgumentKind error_code = {.name = "code", .candidates = ErrorNames, .
 
 Action ErrorList(Arguments &)
 {
-    return [](Call &call) {
-        call.List(error_columns, std::vector<ErrorCode>(ErrorCodes().begin(), ErrorCodes().end()));
-    };
+    return
+        [](Call &call) { call.List(error_columns, std::vector<ErrorCode>(ErrorCodes().begin(), ErrorCodes().end())); };
 }
 
 Action ErrorExplain(Arguments &in)
@@ -71,18 +57,17 @@ Action ErrorExplain(Arguments &in)
 void AddError(Program &program)
 {
     Family &error = program.Add("error", "The library's error codes");
-    error.Add("list", reads, Answer::List(error_columns), R"(Lists the error codes with their meanings.
+    error.Add("list", reads, Answer::List(error_columns), ErrorList, R"(Lists the error codes with their meanings.
 
 tavoctl error list
-tavoctl error list --json)",
-              ErrorList);
-    error.Add("explain", reads, Answer::One(error_columns), R"(Says what an error code means and what usually helps.
+tavoctl error list --json)");
+    error.Add("explain", reads, Answer::One(error_columns), ErrorExplain,
+              R"(Says what an error code means and what usually helps.
 
 tavoctl error explain 0x2000
 tavoctl error explain 8192
 tavoctl error explain ERR_KEY_NOT_FOUND
-tavoctl error explain key_not_found)",
-              ErrorExplain);
+tavoctl error explain key_not_found)");
 }
 
 }  // namespace tavoctl

@@ -3,28 +3,19 @@
 
 #include "families.h"
 #include "frame/error_codes.h"
-#include "frame/failure.h"
 #include "frame/held_locks.h"
-#include "frame/program.h"
 #include "frame/program_run.h"
-#include "frame/suggestion.h"
+#include "frame/text.h"
 
-#include <charconv>
 #include <sstream>
 
 namespace tavoctl {
 namespace {
 
 constexpr Column<TLIBLOCKFILE> lock_columns[] = {
-    {"lock",
-     [](const TLIBLOCKFILE &lock) {
-         return LockName(lock.szPath);
-     }},
+    {"lock", [](const TLIBLOCKFILE &lock) { return LockName(lock.szPath); }},
     {"mask", [](const TLIBLOCKFILE &lock) { return Hexadecimal(static_cast<int>(lock.fLockBit)); }, "hexadecimal"},
-    {"file",
-     [](const TLIBLOCKFILE &lock) {
-         return std::string(lock.szPath);
-     }},
+    {"file", [](const TLIBLOCKFILE &lock) { return std::string(lock.szPath); }},
 };
 
 std::vector<TLIBLOCKFILE> Locks()
@@ -54,17 +45,13 @@ unsigned MaskOf(const std::string &word)
             return lock.fLockBit;
         known |= lock.fLockBit;
     }
-    const bool hexadecimal = word.starts_with("0x") || word.starts_with("0X");
-    const char *end = word.data() + word.size();
-    unsigned mask = 0;
-    const auto [stop, error] = std::from_chars(word.data() + (hexadecimal ? 2 : 0), end, mask, hexadecimal ? 16 : 10);
-    if (error != std::errc{} || stop != end)
+    const auto mask = AnyNumberIn<unsigned>(word);
+    if (!mask)
         throw UsageFailure("take the lock " + word, "there is no such lock",
                            DidYouMean(word, LockNames(), "tavoctl lock list shows them"));
-    if (!mask || (mask & ~known))
-        throw UsageFailure("take the locks " + word, "the mask has other bits than locks",
-                           "tavoctl lock list shows them; --shared says how to take them");
-    return mask;
+    RefuseIf(!*mask || (*mask & ~known), "take the locks " + word, "the mask has other bits than locks",
+             "tavoctl lock list shows them; --shared says how to take them");
+    return *mask;
 }
 
 Action LockRun(Arguments &in)
@@ -78,8 +65,7 @@ Action LockRun(Arguments &in)
         std::istringstream words(*locks);
         for (std::string word; std::getline(words, word, ',');)
             mask |= MaskOf(word);
-        if (!mask)
-            throw UsageFailure("take a lock", "none was named", "tavoctl lock list shows them");
+        RefuseIf(!mask, "take a lock", "none was named", "tavoctl lock list shows them");
         const HeldLocks held(mask, *shared, timeout->value_or(usual_wait));
         call.status = RunInForeground(*program);
     };
@@ -90,22 +76,20 @@ Action LockRun(Arguments &in)
 void AddLock(Program &program)
 {
     Family &lock = program.Add("lock", "The locks by which programs take turns");
-    lock.Add("list", reads, Answer::List(lock_columns), R"(Lists the locks in the order in which they are taken.
+    lock.Add(
+        "list", reads, Answer::List(lock_columns),
+        [](Arguments &) -> Action { return [](Call &call) { call.List(lock_columns, Locks()); }; },
+        R"(Lists the locks in the order in which they are taken.
 
-tavoctl lock list)",
-             [](Arguments &) -> Action {
-                 return [](Call &call) {
-                     call.List(lock_columns, Locks());
-                 };
-             });
-    lock.Add("run", changes | by_anybody | runs_program, Answer::Nothing(), R"(Takes locks, all or none, runs PROGRAM
+tavoctl lock list)");
+    lock.Add("run", changes | by_anybody | runs_program, Answer::Nothing(), LockRun,
+             R"(Takes locks, all or none, runs PROGRAM
 and releases them when it has ended. The exit status is the program's. Inside, `tavoctl conf set` would wait for a lock
 that is held here.
 
 tavoctl lock run tavoinfo -- vi /etc/tavoinfo.conf
 tavoctl lock run --shared pw,gr -- tar cf accounts.tar /etc/passwd /etc/group
-tavoctl lock run --timeout 0 0x840 -- true)",
-             LockRun);
+tavoctl lock run --timeout 0 0x840 -- true)");
 }
 
 }  // namespace tavoctl

@@ -2,17 +2,14 @@
 #include "tavo_proc.h"
 
 #include "families.h"
-#include "frame/failure.h"
 #include "frame/processes.h"
-#include "frame/program.h"
 #include "frame/program_run.h"
-#include "frame/signal_name.h"
+#include "frame/text.h"
 
 #include <array>
 #include <cerrno>
 #include <csignal>
-#include <limits>
-#include <utility>
+#include <cstring>
 
 #include <unistd.h>
 
@@ -28,6 +25,27 @@ constexpr Column<Process> process_columns[] = {
     {"pid", field<&Process::pid>},
     {"command", field<&Process::command>, "its command line, or [NAME]"},
 };
+
+// As the C library has them, without "SIG".
+std::vector<std::string> SignalNames()
+{
+    std::vector<std::string> names;
+    for (int number = 1; number < SIGRTMIN; ++number)
+        if (const char *name = ::sigabbrev_np(number))
+            names.emplace_back(name);
+    return names;
+}
+
+// The number of "HUP", "SIGHUP" or "1"; empty when there is no such signal. 0 is one: it tests.
+std::optional<int> SignalNumber(const std::string &text)
+{
+    const std::string name = text.starts_with("SIG") ? text.substr(3) : text;
+    for (int number = 1; number < SIGRTMIN; ++number)
+        if (const char *known = ::sigabbrev_np(number); known && name == known)
+            return number;
+    const auto number = NumberIn<int>(text);
+    return number && *number >= 0 && *number <= SIGRTMAX ? number : std::nullopt;
+}
 
 constexpr ArgumentKind signal_kind = {.name = "signal",
                                       .allowed = "a name such as HUP, or a number",
@@ -48,8 +66,7 @@ Action ProcFind(Arguments &in)
             if (std::string command = CommandLine(pid); !command.empty())
                 found.push_back({pid, std::move(command)});
         }
-        if (found.empty())
-            throw Failure{.attempted = "find " + *pattern, .reason = "no process matches", .status = exit_not_found};
+        FailIf(found.empty(), "find " + *pattern, "no process matches", {}, exit_not_found);
         call.List(process_columns, found);
     };
 }
@@ -92,8 +109,7 @@ Action ProcRun(Arguments &in)
     const auto timeout = in.Number("--timeout", "SECONDS", "kill it after that time (no limit)", 1);
     const auto words = in.Program();
     return [=](Call &call) {
-        if (words->size() - 1 > most_arguments)
-            throw UsageFailure("run " + words->front(), "it has more than 30 arguments");
+        RefuseIf(words->size() - 1 > most_arguments, "run " + words->front(), "it has more than 30 arguments");
         const std::string program = FindProgram(words->front());
         std::array<const char *, most_arguments> arguments = {};
         for (std::size_t i = 1; i < words->size(); ++i)
@@ -109,25 +125,24 @@ Action ProcRun(Arguments &in)
 void AddProc(Program &program)
 {
     Family &proc = program.Add("proc", "Programs and processes");
-    proc.Add("find", reads, Answer::List(process_columns), R"(Lists the processes whose line in the process table
+    proc.Add("find", reads, Answer::List(process_columns), ProcFind,
+             R"(Lists the processes whose line in the process table
 matches PATTERN.
 
 tavoctl proc find smbd
-tavoctl proc find --json rc.d)",
-             ProcFind);
-    proc.Add("signal", changes | by_anybody, Answer::Change(), R"(Sends a signal to the process that a pid file names.
+tavoctl proc find --json rc.d)");
+    proc.Add("signal", changes | by_anybody, ProcSignal, R"(Sends a signal to the process that a pid file names.
 Signal 0 sends nothing and shows by the exit status whether the process is there.
 
 tavoctl proc signal /var/run/smbd.pid
 tavoctl proc signal /var/run/smbd.pid HUP
-tavoctl proc signal /var/run/smbd.pid 0)",
-             ProcSignal);
-    proc.Add("run", changes | by_anybody | runs_program, Answer::Nothing(), R"(Runs PROGRAM as the appliance's daemons
+tavoctl proc signal /var/run/smbd.pid 0)");
+    proc.Add("run", changes | by_anybody | runs_program, Answer::Nothing(), ProcRun,
+             R"(Runs PROGRAM as the appliance's daemons
 run their tools: in a session of its own, in the directory "/", with no environment but PATH, and with /dev/null as
 standard input, output and error. The exit status is the program's.
 
-tavoctl proc run --timeout 60 /usr/tavo/etc/rc.d/S80samba.sh restart)",
-             ProcRun);
+tavoctl proc run --timeout 60 /usr/tavo/etc/rc.d/S80samba.sh restart)");
 }
 
 }  // namespace tavoctl

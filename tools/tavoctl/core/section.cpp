@@ -3,10 +3,8 @@
 
 #include "families.h"
 #include "frame/containers.h"
-#include "frame/failure.h"
-#include "frame/program.h"
 #include "frame/settings_file.h"
-#include "frame/suggestion.h"
+#include "frame/text.h"
 
 #include <algorithm>
 
@@ -153,8 +151,7 @@ Action SectionSet(Arguments &in)
     const auto new_name = in.Option("--rename", "NAME", any_text, "the section's new name");
     return [=](Call &call) {
         const std::string attempted = InFile("set", *section, file);
-        if (pairs->empty() && !*new_name && !*replace)
-            throw UsageFailure(attempted, "no KEY=VALUE was given");
+        RefuseIf(pairs->empty() && !*new_name && !*replace, attempted, "no KEY=VALUE was given");
         file.Change(call, [&](const char *path) {
             // Check first: the library rewrites the file even if the section is missing.
             RequireSection(file, path, *section, attempted);
@@ -211,35 +208,31 @@ void AddSection(Program &program)
 {
     constexpr unsigned changes_file = changes | by_anybody;
     Family &section = program.Add("section", "Settings files with [sections]");
-    section.Add("list", reads, Answer::List(section_names), R"(Lists the sections of a file in its order.
+    section.Add("list", reads, Answer::List(section_names), SectionList, R"(Lists the sections of a file in its order.
 
-tavoctl section list --file /etc/samba/smb.conf)",
-                SectionList);
-    section.Add("get", reads, Answer::List(section_pairs).OrOne(section_value), R"(Lists the settings of a section,
+tavoctl section list --file /etc/samba/smb.conf)");
+    section.Add("get", reads, Answer::List(section_pairs).OrOne(section_value), SectionGet,
+                R"(Lists the settings of a section,
 sorted by key, or prints the value of one. Of a repeated key the last line counts.
 
 tavoctl section get --file /etc/samba/smb.conf global
-tavoctl section get --file /etc/samba/smb.conf global workgroup)",
-                SectionGet);
-    section.Add("set", changes_file, Answer::Change(), R"(Sets keys of a section that is there, and renames it. Its
+tavoctl section get --file /etc/samba/smb.conf global workgroup)");
+    section.Add("set", changes_file, SectionSet, R"(Sets keys of a section that is there, and renames it. Its
 other settings stay, and so do its comment lines, but the settings change their order. A line that could not stay (one
 without "=") is a reason to refuse.
 
 tavoctl section set --file /etc/samba/smb.conf global workgroup=OFFICE
 tavoctl section set --file /etc/samba/smb.conf --replace photo path=/volume1/photo
-tavoctl section set --file /etc/samba/smb.conf --rename pictures photo)",
-                SectionSet);
-    section.Add("add", changes_file, Answer::Change(), R"(Appends a new section to a file, which is created when it is
+tavoctl section set --file /etc/samba/smb.conf --rename pictures photo)");
+    section.Add("add", changes_file, SectionAdd, R"(Appends a new section to a file, which is created when it is
 missing.
 
-tavoctl section add --file /etc/samba/smb.conf photo path=/volume1/photo ro=guest)",
-                SectionAdd);
-    section.Add("remove", changes_file | destroys, Answer::Change(), R"(Removes a section with its settings. Its comment
+tavoctl section add --file /etc/samba/smb.conf photo path=/volume1/photo ro=guest)");
+    section.Add("remove", changes_file | destroys, SectionRemove, R"(Removes a section with its settings. Its comment
 lines stay, and then belong to the section before it.
 
 tavoctl section remove --file /etc/samba/smb.conf photo
-tavoctl section remove --yes --file /etc/samba/smb.conf photo)",
-                SectionRemove);
+tavoctl section remove --yes --file /etc/samba/smb.conf photo)");
 }
 
 }  // namespace tavoctl

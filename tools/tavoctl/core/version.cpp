@@ -2,9 +2,7 @@
 #include "tavo_error.h"
 
 #include "families.h"
-#include "frame/failure.h"
 #include "frame/host.h"
-#include "frame/program.h"
 
 #include <cerrno>
 #include <filesystem>
@@ -27,30 +25,12 @@ std::string VersionIn(const std::string &file)
 }
 
 constexpr Column<Versions> version_columns[] = {
-    {"tavoctl",
-     [](const Versions &) {
-         return std::string(TAVOCTL_VERSION);
-     }},
-    {"library",
-     [](const Versions &v) {
-         return Maybe(VersionIn(v.library_file));
-     }},
-    {"library_file",
-     [](const Versions &v) {
-         return Maybe(v.library_file);
-     }},
-    {"machine",
-     [](const Versions &v) {
-         return std::string(v.machine.machine);
-     }},
-    {"kernel",
-     [](const Versions &v) {
-         return std::string(v.machine.release);
-     }},
-    {"appliance",
-     [](const Versions &) {
-         return IsAppliance();
-     }},
+    {"tavoctl", [](const Versions &) { return std::string(TAVOCTL_VERSION); }},
+    {"library", [](const Versions &v) { return Maybe(VersionIn(v.library_file)); }},
+    {"library_file", [](const Versions &v) { return Maybe(v.library_file); }},
+    {"machine", [](const Versions &v) { return std::string(v.machine.machine); }},
+    {"kernel", [](const Versions &v) { return std::string(v.machine.release); }},
+    {"appliance", [](const Versions &) { return IsAppliance(); }},
 };
 
 // The file that the library was loaded from, with the links followed: its name ends in the version.
@@ -79,12 +59,12 @@ Action ShowVersion(Arguments &)
 void AddVersion(Program &program)
 {
     program.Add("version", "The versions of this program and of the library")
-        .Add("", reads, Answer::One(version_columns), R"(Shows the versions of this program and of the library that it
+        .Add("", reads, Answer::One(version_columns), ShowVersion,
+             R"(Shows the versions of this program and of the library that it
 runs on, and the machine.
 
 tavoctl version
-tavoctl version --json)",
-             ShowVersion);
+tavoctl version --json)");
 }
 
 }  // namespace tavoctl

@@ -3,6 +3,7 @@
 #define TAVOCTL_KERNEL_SOCKET_H
 
 #include "frame/failure.h"
+#include "frame/files.h"
 
 #include <cerrno>
 #include <cstdint>
@@ -11,26 +12,22 @@
 
 #include <linux/netlink.h>
 #include <sys/socket.h>
-#include <unistd.h>
 
 namespace tavoctl {
 
 class KernelSocket {
   public:
     KernelSocket(int protocol, uint32_t groups)
-        : fd_(::socket(AF_NETLINK, SOCK_RAW | SOCK_CLOEXEC | SOCK_NONBLOCK, protocol))
+        : socket_(::socket(AF_NETLINK, SOCK_RAW | SOCK_CLOEXEC | SOCK_NONBLOCK, protocol))
     {
         sockaddr_nl address = {};
         address.nl_family = AF_NETLINK;
         address.nl_groups = groups;
-        if (fd_ < 0 || ::bind(fd_, reinterpret_cast<sockaddr *>(&address), sizeof address) != 0)
+        if (!socket_.IsOpen() || ::bind(Get(), reinterpret_cast<sockaddr *>(&address), sizeof address) != 0)
             throw SystemFailure("listen to the kernel", errno);
     }
-    ~KernelSocket() { ::close(fd_); }
-    KernelSocket(const KernelSocket &) = delete;
-    KernelSocket &operator=(const KernelSocket &) = delete;
 
-    int Get() const { return fd_; }
+    int Get() const { return socket_.Get(); }
 
     // The next message from the kernel itself; nothing when there is none.
     std::optional<std::string> Receive() const
@@ -40,7 +37,7 @@ class KernelSocket {
             sockaddr_nl sender = {};
             socklen_t size = sizeof sender;
             const ssize_t count =
-                ::recvfrom(fd_, bytes.data(), bytes.size(), 0, reinterpret_cast<sockaddr *>(&sender), &size);
+                ::recvfrom(Get(), bytes.data(), bytes.size(), 0, reinterpret_cast<sockaddr *>(&sender), &size);
             // Too many events at once: some are lost, the following ones are not.
             if (count < 0 && (errno == EINTR || errno == ENOBUFS))
                 continue;
@@ -54,7 +51,7 @@ class KernelSocket {
     }
 
   private:
-    int fd_;
+    Descriptor socket_;
 };
 
 }  // namespace tavoctl

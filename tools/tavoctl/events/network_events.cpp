@@ -1,7 +1,7 @@
 // Events of links and addresses.
 #include "events/event.h"
 #include "events/kernel_socket.h"
-#include "storage/device.h"
+#include "frame/files.h"
 
 #include <map>
 #include <string>

@@ -1,6 +1,7 @@
 // Events of services: their pid files come and go, and their processes end.
 #include "events/event.h"
 #include "frame/failure.h"
+#include "frame/files.h"
 #include "service/service_state.h"
 
 #include <algorithm>
@@ -17,47 +18,28 @@
 namespace tavoctl {
 namespace {
 
-// Reports the end of a process to poll.
-class ProcessEnd {
-  public:
-    explicit ProcessEnd(pid_t pid) : fd_(static_cast<int>(::syscall(SYS_pidfd_open, pid, 0))) {}
-    ~ProcessEnd()
-    {
-        if (fd_ >= 0)
-            ::close(fd_);
-    }
-    ProcessEnd(const ProcessEnd &) = delete;
-    ProcessEnd &operator=(const ProcessEnd &) = delete;
-    int Get() const { return fd_; }
-
-  private:
-    int fd_;
-};
-
 class ServiceSource : public EventSource {
   public:
-    ServiceSource() : fd_(::inotify_init1(IN_CLOEXEC | IN_NONBLOCK))
+    ServiceSource() : changes_(::inotify_init1(IN_CLOEXEC | IN_NONBLOCK))
     {
-        if (fd_ < 0)
+        if (!changes_.IsOpen())
             throw SystemFailure("watch the services", errno);
         for (int id = 0; TAVOServiceNameGet(id); ++id) {
             const char *proc = TAVOServiceProcGet(id);
             const std::string path = proc ? proc : "";
             if (const std::size_t slash = path.rfind('/'); slash != path.npos && slash > 0) {
                 pid_files_.insert(path.substr(slash + 1));
-                ::inotify_add_watch(fd_, path.substr(0, slash).c_str(),
+                ::inotify_add_watch(changes_.Get(), path.substr(0, slash).c_str(),
                                     IN_CREATE | IN_DELETE | IN_CLOSE_WRITE | IN_MOVED_TO | IN_MOVED_FROM);
             }
         }
         Read();
     }
-    ~ServiceSource() override { ::close(fd_); }
-
     std::vector<pollfd> Wanted() const override
     {
-        std::vector<pollfd> wanted = {{fd_, POLLIN, 0}};
+        std::vector<pollfd> wanted = {{changes_.Get(), POLLIN, 0}};
         for (const auto &[name, end] : ends_)
-            if (end->Get() >= 0)
+            if (end->IsOpen())
                 wanted.push_back({end->Get(), POLLIN, 0});
         return wanted;
     }
@@ -88,7 +70,7 @@ class ServiceSource : public EventSource {
     {
         bool changed = false;
         alignas(inotify_event) char bytes[4096];
-        for (ssize_t count; (count = ::read(fd_, bytes, sizeof bytes)) > 0;) {
+        for (ssize_t count; (count = ::read(changes_.Get(), bytes, sizeof bytes)) > 0;) {
             const inotify_event *event = nullptr;
             for (const char *at = bytes; at < bytes + count; at += sizeof *event + event->len) {
                 event = reinterpret_cast<const inotify_event *>(at);
@@ -118,16 +100,16 @@ class ServiceSource : public EventSource {
         running_ = std::move(now);
         for (const auto &[name, pid] : running_)
             if (!ends_.contains(name))
-                ends_[name] = std::make_unique<ProcessEnd>(pid);
+                ends_[name] = std::make_unique<Descriptor>(static_cast<int>(::syscall(SYS_pidfd_open, pid, 0)));
     }
 
     static constexpr std::chrono::milliseconds look_interval{2000};
 
-    int fd_;
+    Descriptor changes_;
     std::chrono::steady_clock::time_point next_look_{};
     std::set<std::string, std::less<>> pid_files_;  // by their names alone
     std::map<std::string, pid_t> running_;
-    std::map<std::string, std::unique_ptr<ProcessEnd>> ends_;
+    std::map<std::string, std::unique_ptr<Descriptor>> ends_;  // they report the end of the processes to poll
 };
 
 }  // namespace

@@ -8,7 +8,6 @@
 #include <algorithm>
 #include <cerrno>
 #include <map>
-#include <string_view>
 
 #include <fcntl.h>
 #include <linux/netlink.h>
@@ -21,28 +20,25 @@ namespace {
 // A file of the kernel's that says by poll when it has changed.
 class ChangingFile {
   public:
-    explicit ChangingFile(const char *path) : fd_(::open(path, O_RDONLY | O_CLOEXEC))
+    explicit ChangingFile(const char *path) : file_(::open(path, O_RDONLY | O_CLOEXEC))
     {
-        if (fd_ < 0)
+        if (!file_.IsOpen())
             throw SystemFailure(std::string("watch ") + path, errno);
         Reread();
     }
-    ~ChangingFile() { ::close(fd_); }
-    ChangingFile(const ChangingFile &) = delete;
-    ChangingFile &operator=(const ChangingFile &) = delete;
 
-    pollfd Wanted() const { return {fd_, POLLPRI | POLLERR, 0}; }
+    pollfd Wanted() const { return {file_.Get(), POLLPRI | POLLERR, 0}; }
     // Until it is read, it is reported again.
     void Reread() const
     {
         char bytes[4096];
-        ::lseek(fd_, 0, SEEK_SET);
-        while (::read(fd_, bytes, sizeof bytes) > 0)
+        ::lseek(file_.Get(), 0, SEEK_SET);
+        while (::read(file_.Get(), bytes, sizeof bytes) > 0)
             ;
     }
 
   private:
-    int fd_;
+    Descriptor file_;
 };
 
 class DiskSource : public EventSource {

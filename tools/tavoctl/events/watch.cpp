@@ -1,10 +1,8 @@
 // tavoctl watch: one line for each thing that happens.
 #include "events/event.h"
 #include "families.h"
-#include "frame/failure.h"
-#include "frame/program.h"
 #include "frame/program_run.h"
-#include "frame/terminal_text.h"
+#include "frame/text.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -22,15 +20,9 @@ struct TimedEvent {
 
 constexpr Column<TimedEvent> event_columns[] = {
     {"time", field<&TimedEvent::time>, "in UTC"},
-    {"event",
-     [](const TimedEvent &e) {
-         return e.what.event;
-     }},
+    {"event", [](const TimedEvent &e) { return e.what.event; }},
     {"object", [](const TimedEvent &e) { return e.what.object; }, "disk, array, folder, interface or service"},
-    {"detail",
-     [](const TimedEvent &e) {
-         return Maybe(e.what.detail);
-     }},
+    {"detail", [](const TimedEvent &e) { return Maybe(e.what.detail); }},
 };
 
 std::string Now()
@@ -49,9 +41,7 @@ class Requests {
     Requests()
     {
         struct sigaction action = {};
-        action.sa_handler = [](int) {
-            asked_ = 1;
-        };
+        action.sa_handler = [](int) { asked_ = 1; };
         sigset_t blocked;
         ::sigemptyset(&blocked);
         for (const int number : {SIGINT, SIGTERM}) {
@@ -139,7 +129,8 @@ Action WatchEvents(Arguments &in)
 void AddWatch(Program &program)
 {
     program.Add("watch", "What happens, as it happens")
-        .Add("", reads, Answer::One(event_columns), R"(Prints a line for each thing that happens, until it is
+        .Add("", reads, Answer::One(event_columns), WatchEvents,
+             R"(Prints a line for each thing that happens, until it is
 interrupted: a disk comes or goes (disk-in, disk-out), an array starts, stops, or changes its health (array-started,
 array-stopped, array-degraded, array-crashed, array-normal), a member fails, is added or removed (member-failed,
 member-added, member-removed), a rebuild or scrub goes on (rebuild-begun, rebuild-progress, rebuild-ended), a file
@@ -149,8 +140,7 @@ service-restarted). The kernel tells it; no disk is read or woken.
 
 tavoctl watch
 tavoctl watch --json
-tavoctl watch --exec /usr/local/bin/tell-me)",
-             WatchEvents);
+tavoctl watch --exec /usr/local/bin/tell-me)");
 }
 
 }  // namespace tavoctl

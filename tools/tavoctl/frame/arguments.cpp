@@ -2,13 +2,11 @@
 #include "frame/arguments.h"
 
 #include "frame/failure.h"
-#include "frame/paragraph.h"
-#include "frame/suggestion.h"
+#include "frame/text.h"
 
 #include <CLI/CLI.hpp>
 
 #include <algorithm>
-#include <charconv>
 #include <utility>
 
 namespace tavoctl {
@@ -81,13 +79,10 @@ ArgumentText TextOf(const std::string &name, const std::string &value, const std
 
 int64_t ParseNumber(const std::string &name, const std::string &word, int64_t least, int64_t most)
 {
-    int64_t number = 0;
-    const char *end = word.data() + word.size();
-    const auto [stop, error] = std::from_chars(word.data(), end, number);
-    if (error != std::errc() || stop != end || number < least || number > most)
-        throw UsageFailure("take " + word + " as " + name,
-                           "allowed: a number from " + std::to_string(least) + " to " + std::to_string(most));
-    return number;
+    const auto number = NumberIn<int64_t>(word);
+    RefuseIf(!number || *number < least || *number > most, "take " + word + " as " + name,
+             "allowed: a number from " + std::to_string(least) + " to " + std::to_string(most));
+    return *number;
 }
 
 }  // namespace
@@ -169,9 +164,7 @@ Given<bool> Arguments::Flag(const char *name, std::string help)
 Given<Words> Arguments::Program()
 {
     Given<Words> given;
-    parts_->program = [given](Words words) {
-        given.Set(std::move(words));
-    };
+    parts_->program = [given](Words words) { given.Set(std::move(words)); };
     parts_->app.prefix_command();
     parts_->texts.push_back(TextOf("PROGRAM", "PROGRAM", "the program, then its arguments", any_text, true, true));
     return given;
@@ -199,9 +192,8 @@ bool Arguments::Parse(Words words)
             wrong = "PROGRAM is required";
         parts_->program(std::move(program));
     }
-    if (!wrong.empty())
-        throw UsageFailure("understand the command line", wrong,
-                           hint.empty() ? "see " + parts_->command + " --help" : hint);
+    RefuseIf(!wrong.empty(), "understand the command line", wrong,
+             hint.empty() ? "see " + parts_->command + " --help" : hint);
     // Flags first: a failure of the others is reported as --json says.
     for (const bool flags : {true, false})
         for (std::size_t i = 0; i < parts_->readers.size(); ++i)

@@ -1,9 +1,7 @@
 // How a verb answers and asks.
 #include "frame/error_codes.h"
-#include "frame/failure.h"
-#include "frame/table.h"
 #include "frame/terminal.h"
-#include "frame/terminal_text.h"
+#include "frame/text.h"
 #include "frame/verb.h"
 
 #include <algorithm>
@@ -87,14 +85,12 @@ void Call::Confirm(const std::string &question) const
 {
     if (yes || dry_run)
         return;
-    if (!::isatty(STDIN_FILENO) || !::isatty(STDERR_FILENO))
-        throw UsageFailure("go on without an answer to \"" + question + "\"", "there is no terminal to ask at",
-                           "--yes does it without asking");
+    RefuseIf(!::isatty(STDIN_FILENO) || !::isatty(STDERR_FILENO), "go on without an answer to \"" + question + "\"",
+             "there is no terminal to ask at", "--yes does it without asking");
     std::cerr << Printable(question) << " [y/N] " << std::flush;
     std::string answer;
     std::getline(std::cin, answer);
-    if (answer != "y" && answer != "Y" && answer != "yes")
-        throw Failure{.attempted = "go on", .reason = "the answer was no", .status = exit_failed};
+    FailIf(answer != "y" && answer != "Y" && answer != "yes", "go on", "the answer was no");
 }
 
 }  // namespace tavoctl

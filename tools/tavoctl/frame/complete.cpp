@@ -11,12 +11,11 @@ std::vector<std::string> OfVerb(const Arguments &declared, const std::vector<std
 {
     std::vector<const ArgumentText *> places;
     std::vector<std::string> options;
-    for (const ArgumentText &text : declared.Texts()) {
+    for (const ArgumentText &text : declared.Texts())
         if (text.positional)
             places.push_back(&text);
         else
             options.push_back(text.name);
-    }
 
     std::size_t place = 0;
     const ArgumentText *pending = nullptr;  // an option that waits for its value

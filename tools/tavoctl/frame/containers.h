@@ -11,6 +11,12 @@
 
 namespace tavoctl {
 
+// Deletes by a function of a library: std::unique_ptr<RAIDINFO, By<RAIDInfoFree>>.
+template <auto release>
+struct By {
+    void operator()(auto *held) const { release(held); }
+};
+
 // A list that functions fill through Address(), since it may move.
 class StringList {
   public:

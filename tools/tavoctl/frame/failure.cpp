@@ -5,13 +5,15 @@
 
 #include "frame/error_codes.h"
 #include "frame/table.h"
-#include "frame/terminal_text.h"
+#include "frame/text.h"
 
 #include <nlohmann/json.hpp>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <iostream>
+#include <iterator>
 #include <utility>
 #include <vector>
 
@@ -21,38 +23,24 @@
 namespace tavoctl {
 namespace {
 
+constexpr int absent_codes[] = {ERR_PATH_NOT_FOUND, ERR_FILE_NOT_FOUND,  ERR_KEY_NOT_FOUND, ERR_SECTION_NOT_FOUND,
+                                ERR_NO_SUCH_SHARE,  ERR_NO_SUCH_GROUP,   ERR_NO_SUCH_USER,  ERR_NO_VOLUME_ID,
+                                ERR_NO_DISK_ID,     ERR_BACKUP_NOT_FOUND};
+constexpr int busy_codes[] = {ERR_LOCK_FAILED, ERR_DEVICE_BUSY};
+constexpr int usage_codes[] = {ERR_BAD_PARAMETERS,      ERR_USAGE,
+                               ERR_INVALID_SERVERNAME,  ERR_INVALID_DOMAINNAME,
+                               ERR_INVALID_NETNAME,     ERR_INVALID_SHARENAME,
+                               ERR_INVALID_GROUPNAME,   ERR_INVALID_USERNAME,
+                               ERR_INVALID_PASSWORDNAME};
+
 int StatusOf(int code)
 {
-    switch (code) {
-    case ERR_PATH_NOT_FOUND:
-    case ERR_FILE_NOT_FOUND:
-    case ERR_KEY_NOT_FOUND:
-    case ERR_SECTION_NOT_FOUND:
-    case ERR_NO_SUCH_SHARE:
-    case ERR_NO_SUCH_GROUP:
-    case ERR_NO_SUCH_USER:
-    case ERR_NO_VOLUME_ID:
-    case ERR_NO_DISK_ID:
-    case ERR_BACKUP_NOT_FOUND:
-        return exit_not_found;
-    case ERR_LOCK_FAILED:
-    case ERR_DEVICE_BUSY:
-        return exit_busy;
-    case ERR_BAD_PARAMETERS:
-    case ERR_USAGE:
-    case ERR_INVALID_SERVERNAME:
-    case ERR_INVALID_DOMAINNAME:
-    case ERR_INVALID_NETNAME:
-    case ERR_INVALID_SHARENAME:
-    case ERR_INVALID_GROUPNAME:
-    case ERR_INVALID_USERNAME:
-    case ERR_INVALID_PASSWORDNAME:
-        return exit_usage;
-    case ERR_ACCESS_DENIED:
-        return exit_denied;
-    default:
-        return exit_failed;
-    }
+    const auto is_one_of = [code](const auto &all) { return std::count(std::begin(all), std::end(all), code) > 0; };
+    return is_one_of(absent_codes)     ? exit_not_found
+           : is_one_of(busy_codes)     ? exit_busy
+           : is_one_of(usage_codes)    ? exit_usage
+           : code == ERR_ACCESS_DENIED ? exit_denied
+                                       : exit_failed;
 }
 
 // Checks for as many descriptors as the library needs at a time. Without them even a free lock cannot be taken.
@@ -141,6 +129,23 @@ void Must(bool condition, const std::string &attempted, const std::string &hint)
 void Must(bool condition, const std::string &attempted, const HintFor &hint)
 {
     Must(condition, attempted, std::string(condition || TLIBErrGet() != hint.code ? hint.otherwise : hint.hint));
+}
+
+void FailIf(bool condition, const std::string &attempted, const std::string &reason, const std::string &hint,
+            int status)
+{
+    if (condition)
+        throw Failure{.attempted = attempted, .reason = reason, .hint = hint, .status = status};
+}
+
+void RefuseIf(bool condition, const std::string &attempted, const std::string &reason, const std::string &hint)
+{
+    FailIf(condition, attempted, reason, hint, exit_usage);
+}
+
+void BusyIf(bool condition, const std::string &attempted, const std::string &reason, const std::string &hint)
+{
+    FailIf(condition, attempted, reason, hint, exit_busy);
 }
 
 Failure SystemFailure(std::string attempted, int error)

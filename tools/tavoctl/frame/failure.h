@@ -1,13 +1,28 @@
-// The exception of a verb that fails.
+// The exception of a verb that fails, and the exit statuses.
 #ifndef TAVOCTL_FAILURE_H
 #define TAVOCTL_FAILURE_H
-
-#include "frame/exit_status.h"
 
 #include <optional>
 #include <string>
 
 namespace tavoctl {
+
+// Scripts rely on these.
+enum ExitStatus : int {
+    exit_done = 0,
+    exit_failed = 1,
+    exit_usage = 2,      // the command line or an argument is wrong, whichever layer noticed
+    exit_not_found = 3,  // the object is not there
+    exit_busy = 4,       // another program holds a lock or a device: trying again may help
+    exit_denied = 5,     // permission denied: only root may do it
+};
+
+// The status of `lock run` for a program that it could not run, as in shells.
+enum ProgramStatus : int {
+    exit_cannot_execute = 126,
+    exit_no_such_program = 127,
+    exit_by_signal = 128,  // plus the number of the signal that ended the program
+};
 
 struct Failure {
     std::string attempted;    // completes "cannot ..."
@@ -19,6 +34,7 @@ struct Failure {
     std::optional<int> status = {};  // unless the code decides
     std::string path = {};           // the file that could not be opened, where it is known
 
+    void AddHint(const std::string &further) { hint += (hint.empty() ? "" : "; ") + further; }
     int Status() const;
     std::string Hint() const;
     std::string Text(bool verbose) const;  // one line, safe for a terminal; verbose: also where in the library
@@ -41,6 +57,13 @@ struct HintFor {
     const char *otherwise = "";
 };
 void Must(bool condition, const std::string &attempted, const HintFor &hint);
+
+// Throw a Failure when the condition holds: something that the library would not notice, an argument that tavoctl itself
+// refuses, an object that another program uses.
+void FailIf(bool condition, const std::string &attempted, const std::string &reason, const std::string &hint = {},
+            int status = exit_failed);
+void RefuseIf(bool condition, const std::string &attempted, const std::string &reason, const std::string &hint = {});
+void BusyIf(bool condition, const std::string &attempted, const std::string &reason, const std::string &hint = {});
 
 // A failed system call, by its errno.
 Failure SystemFailure(std::string attempted, int error);

@@ -4,7 +4,7 @@
 #include "tavo_lock.h"
 
 #include "frame/failure.h"
-#include "frame/progress.h"
+#include "frame/terminal.h"
 
 #include <string_view>
 
@@ -50,8 +50,7 @@ HeldLocks::HeldLocks(unsigned mask, bool shared, int64_t timeout) : mask_(mask)
 {
     const unsigned way = TAVO_LOCK_NONBLOCKING | (shared ? TAVO_LOCK_SHARED : TAVO_LOCK_EXCLUSIVE);
     const std::string names = NamesOf(mask);
-    if (!Take(mask | way, static_cast<int>(timeout), names))
-        throw LibraryFailure("take the lock " + names);
+    Must(Take(mask | way, static_cast<int>(timeout), names), "take the lock " + names);
 }
 
 HeldLocks::~HeldLocks()

@@ -1,6 +1,6 @@
 // The texts of --help.
-#include "frame/paragraph.h"
 #include "frame/program.h"
+#include "frame/text.h"
 
 #include <sstream>
 

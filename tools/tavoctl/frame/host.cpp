@@ -16,10 +16,8 @@ bool IsAppliance()
 
 void RefuseForeignHost()
 {
-    if (!IsAppliance())
-        throw Failure{.attempted = "change this machine",
-                      .reason = std::string("it is not an appliance: there is no ") + defaults_file,
-                      .hint = "--force-host does it anyway"};
+    FailIf(!IsAppliance(), "change this machine", std::string("it is not an appliance: there is no ") + defaults_file,
+           "--force-host does it anyway");
 }
 
 }  // namespace tavoctl

@@ -1,4 +1,4 @@
-// JSON from a caller.
+// JSON: facts, and documents from a caller.
 #include "frame/json_document.h"
 
 #include "frame/failure.h"
@@ -38,6 +38,20 @@ class KeysOnce {
 };
 
 }  // namespace
+
+Json ToJson(const Cell &cell)
+{
+    return std::visit(
+        [](const auto &value) -> Json {
+            if constexpr (std::is_same_v<std::decay_t<decltype(value)>, std::monostate>)
+                return nullptr;
+            else if constexpr (std::is_same_v<std::decay_t<decltype(value)>, Bytes>)
+                return value.count;
+            else
+                return value;
+        },
+        cell.Get());
+}
 
 Json ParseJsonDocument(const std::string &text)
 {

@@ -1,11 +1,9 @@
 // The man page, written from what the verbs declare.
-#include "frame/failure.h"
 #include "frame/program.h"
 
 #include <cctype>
 #include <cerrno>
 #include <fstream>
-#include <string_view>
 
 namespace tavoctl {
 namespace {

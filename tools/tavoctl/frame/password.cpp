@@ -2,7 +2,7 @@
 #include "frame/password.h"
 
 #include "frame/failure.h"
-#include "frame/terminal_text.h"
+#include "frame/text.h"
 
 #include <cerrno>
 #include <csignal>
@@ -75,8 +75,7 @@ std::string ReadLine()
             throw Failure{.attempted = "read the password", .reason = std::strerror(errno)};
         if (count == 0 || c == '\n')
             return line;
-        if (c == '\0' || line.size() == longest)
-            throw UsageFailure("take the password", "it is too long, or no text");
+        RefuseIf(c == '\0' || line.size() == longest, "take the password", "it is too long, or no text");
         line += c;
     }
 }
@@ -99,10 +98,8 @@ std::string AskPassword(const std::string &name)
 {
     const bool terminal = ::isatty(STDIN_FILENO) && ::isatty(STDERR_FILENO);
     std::string password = terminal ? ReadHidden("Password of " + name + ": ") : ReadLine();
-    if (password.empty())
-        throw UsageFailure("set the password of " + name, "none was given", password_hint);
-    if (terminal && ReadHidden("Again: ") != password)
-        throw Failure{.attempted = "set the password of " + name, .reason = "the two differ"};
+    RefuseIf(password.empty(), "set the password of " + name, "none was given", password_hint);
+    FailIf(terminal && ReadHidden("Again: ") != password, "set the password of " + name, "the two differ");
     return password;
 }
 
@@ -125,8 +122,7 @@ PasswordChoice::PasswordChoice(Arguments &in)
 
 std::string PasswordChoice::For(const std::string &name) const
 {
-    if (*empty_ && *unknown_)
-        throw UsageFailure("choose a password", "--empty-password and --unknown-password exclude each other");
+    RefuseIf(*empty_ && *unknown_, "choose a password", "--empty-password and --unknown-password exclude each other");
     return *empty_ ? std::string() : *unknown_ ? UnknownPassword() : AskPassword(name);
 }
 

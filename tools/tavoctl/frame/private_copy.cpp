@@ -2,7 +2,7 @@
 #include "frame/private_copy.h"
 
 #include "frame/failure.h"
-#include "frame/input_file.h"
+#include "frame/files.h"
 #include "frame/unified_diff.h"
 
 #include <cerrno>

@@ -4,11 +4,11 @@
 #include "tavo_proc.h"
 
 #include "frame/failure.h"
+#include "frame/files.h"
 
 #include <algorithm>
 #include <ctime>
 #include <fstream>
-#include <iterator>
 #include <limits>
 #include <sstream>
 
@@ -18,12 +18,6 @@ namespace tavoctl {
 namespace {
 
 constexpr std::size_t usual_room = 64;
-
-std::string ReadAll(const std::string &path)
-{
-    std::ifstream in(path, std::ios::binary);
-    return {std::istreambuf_iterator<char>(in), {}};
-}
 
 bool IsShell(const std::string &name)
 {
@@ -74,8 +68,7 @@ std::vector<pid_t> MatchingProcesses(const std::string &pattern)
     std::vector<pid_t> pids(usual_room);
     for (;;) {
         const int count = TLIBPs(pattern.c_str(), pids.data(), static_cast<int>(pids.size()));
-        if (count < 0)
-            throw LibraryFailure("find " + pattern);
+        Must(count >= 0, "find " + pattern);
         const bool all = static_cast<std::size_t>(count) <= pids.size();
         pids.resize(static_cast<std::size_t>(count));
         if (all)
@@ -86,11 +79,11 @@ std::vector<pid_t> MatchingProcesses(const std::string &pattern)
 std::string CommandLine(pid_t pid)
 {
     const std::string folder = "/proc/" + std::to_string(pid);
-    std::string words = ReadAll(folder + "/cmdline");
+    std::string words = FileText(folder + "/cmdline");
     while (words.ends_with('\0'))
         words.pop_back();
     std::replace(words.begin(), words.end(), '\0', ' ');
-    const std::string stat = words.empty() ? ReadAll(folder + "/stat") : "";
+    const std::string stat = words.empty() ? FileText(folder + "/stat") : "";
     const std::size_t name = stat.find('(');
     const std::size_t end = stat.rfind(") ");
     if (name == std::string::npos || end == std::string::npos || stat.compare(end + 2, 1, "Z") == 0)
@@ -100,10 +93,9 @@ std::string CommandLine(pid_t pid)
 
 pid_t ProcessOf(const std::string &name)
 {
-    for (const pid_t pid : MatchingProcesses(name)) {
+    for (const pid_t pid : MatchingProcesses(name))
         if (pid != ::getpid() && Runs(CommandLine(pid), name))
             return pid;
-    }
     return 0;
 }
 
@@ -111,7 +103,7 @@ std::string StartOf(pid_t pid)
 {
     // The name, in parentheses, may hold anything; the start is the 20th field after it, in clock ticks since the boot.
     constexpr int start_field = 20;
-    const std::string stat = ReadAll("/proc/" + std::to_string(pid) + "/stat");
+    const std::string stat = FileText("/proc/" + std::to_string(pid) + "/stat");
     const std::size_t behind_name = stat.rfind(") ");
     if (behind_name == std::string::npos)
         return {};

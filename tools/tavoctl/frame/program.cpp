@@ -4,10 +4,8 @@
 #include "tavo_error.h"
 
 #include "families.h"
-#include "frame/failure.h"
 #include "frame/host.h"
-#include "frame/suggestion.h"
-#include "frame/terminal_text.h"
+#include "frame/text.h"
 
 #include <algorithm>
 #include <cctype>
@@ -15,7 +13,6 @@
 #include <iostream>
 #include <new>
 #include <sstream>
-#include <utility>
 
 #include <unistd.h>
 
@@ -52,11 +49,8 @@ void RefuseWithoutRights(const VerbEntry &entry, const Call &call)
         return;
     if (!call.force_host)
         RefuseForeignHost();
-    if (!(entry.traits & by_anybody) && ::geteuid() != 0)
-        throw Failure{.attempted = "change this machine",
-                      .reason = "permission denied",
-                      .hint = "run it as root",
-                      .status = exit_denied};
+    FailIf(!(entry.traits & by_anybody) && ::geteuid() != 0, "change this machine", "permission denied",
+           "run it as root", exit_denied);
 }
 
 void PrintReport(const Call &call)
@@ -82,8 +76,7 @@ std::vector<std::string> ChosenColumns(const std::string &list, const std::vecto
                                DidYouMean(name, known, "allowed: " + Joined(known, ", ")));
         chosen.push_back(name);
     }
-    if (chosen.empty())
-        throw UsageFailure("take " + list + " as --output", "no column is named", "allowed: " + Joined(known, ", "));
+    RefuseIf(chosen.empty(), "take " + list + " as --output", "no column is named", "allowed: " + Joined(known, ", "));
     return chosen;
 }
 
@@ -98,8 +91,8 @@ std::string VerbEntry::Summary() const
     return sentence.ends_with('.') ? sentence.substr(0, sentence.size() - 1) : sentence;
 }
 
-void Family::Add(const char *name, unsigned traits, Answer answer, std::string_view text,
-                 Action (*declare)(Arguments &))
+void Family::Add(const char *name, unsigned traits, Answer answer, Action (*declare)(Arguments &),
+                 std::string_view text)
 {
     const std::size_t gap = std::min(text.find("\n\n"), text.size());
     verbs_.push_back({name, traits, std::move(answer), std::string(text.substr(0, gap)),
@@ -256,8 +249,7 @@ int Program::RunVerb(const Family &family, const VerbEntry &entry, std::vector<s
         if (entry.ReportsChanges() && (call.json || call.dry_run))
             PrintReport(call);
         // An answer that did not arrive is not an answer.
-        if (!std::cout.flush())
-            throw Failure{.attempted = "write to standard output", .reason = "it is full or closed"};
+        FailIf(!std::cout.flush(), "write to standard output", "it is full or closed");
         return call.status;
     } catch (const Failure &failure) {
         return Report(failure, call);

@@ -4,10 +4,7 @@
 
 #include "frame/verb.h"
 
-#include <memory>
-#include <string>
 #include <string_view>
-#include <vector>
 
 namespace tavoctl {
 
@@ -28,7 +25,12 @@ class Family {
     Family(const char *name, const char *purpose) : name_(name), purpose_(purpose) {}
 
     // The text is what the verb does, an empty line, and examples, a command a line.
-    void Add(const char *name, unsigned traits, Answer answer, std::string_view text, Action (*declare)(Arguments &));
+    void Add(const char *name, unsigned traits, Answer answer, Action (*declare)(Arguments &), std::string_view text);
+    // A verb that answers with what it has changed.
+    void Add(const char *name, unsigned traits, Action (*declare)(Arguments &), std::string_view text)
+    {
+        Add(name, traits, {.form = Answer::change}, declare, text);
+    }
 
     const char *Name() const { return name_; }
     const char *Purpose() const { return purpose_; }

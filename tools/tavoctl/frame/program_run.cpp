@@ -1,7 +1,6 @@
 // A program of the caller's, run as a shell would run it.
 #include "frame/program_run.h"
 
-#include "frame/exit_status.h"
 #include "frame/failure.h"
 
 #include <cerrno>

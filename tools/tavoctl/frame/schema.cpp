@@ -1,5 +1,4 @@
 // Descriptions of the verbs for programs: JSON Schemas of the answers, and the list of the verbs.
-#include "frame/failure.h"
 #include "frame/program.h"
 
 #include <nlohmann/json.hpp>

@@ -37,11 +37,8 @@ void RefuseUnwritable(const std::string &path)
 {
     const bool there = ::eaccess(path.c_str(), F_OK) == 0;
     const std::filesystem::path folder = std::filesystem::absolute(path).parent_path();
-    if (::eaccess(there ? path.c_str() : folder.c_str(), W_OK) != 0 && errno == EACCES)
-        throw Failure{.attempted = "change " + path,
-                      .reason = "permission denied",
-                      .hint = "run it as root",
-                      .status = exit_denied};
+    FailIf(::eaccess(there ? path.c_str() : folder.c_str(), W_OK) != 0 && errno == EACCES, "change " + path,
+           "permission denied", "run it as root", exit_denied);
 }
 
 }  // namespace
@@ -69,10 +66,8 @@ SettingsFile SettingsFile::Any(Arguments &in, unsigned trait)
 
 std::string SettingsFile::Path() const
 {
-    if (*defaults_ && *file_)
-        throw UsageFailure("choose a file", "--file and --defaults name two");
-    if (!*file_ && must_be_named_)
-        throw UsageFailure("choose a file", "--file PATH is required");
+    RefuseIf(*defaults_ && *file_, "choose a file", "--file and --defaults name two");
+    RefuseIf(!*file_ && must_be_named_, "choose a file", "--file PATH is required");
     return file_->value_or(*defaults_ ? defaults_file : settings_file);
 }
 

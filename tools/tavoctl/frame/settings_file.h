@@ -2,14 +2,7 @@
 #ifndef TAVOCTL_SETTINGS_FILE_H
 #define TAVOCTL_SETTINGS_FILE_H
 
-#include "frame/failure.h"
 #include "frame/verb.h"
-
-#include <functional>
-#include <optional>
-#include <string>
-#include <utility>
-#include <vector>
 
 namespace tavoctl {
 

@@ -1,8 +1,10 @@
 // Aligned text and JSON from the same facts.
 #include "frame/table.h"
 
+#include "frame/containers.h"
+#include "frame/json_document.h"
 #include "frame/terminal.h"
-#include "frame/terminal_text.h"
+#include "frame/text.h"
 
 #include <nlohmann/json.hpp>
 
@@ -40,20 +42,6 @@ std::string Readable(Bytes bytes)
     return text;
 }
 
-nlohmann::ordered_json ToJson(const Cell &cell)
-{
-    return std::visit(
-        [](const auto &value) -> nlohmann::ordered_json {
-            if constexpr (std::is_same_v<std::decay_t<decltype(value)>, std::monostate>)
-                return nullptr;
-            else if constexpr (std::is_same_v<std::decay_t<decltype(value)>, Bytes>)
-                return value.count;
-            else
-                return value;
-        },
-        cell.Get());
-}
-
 nlohmann::ordered_json NewDocument()
 {
     return {{"format_version", format_version}};
@@ -77,10 +65,6 @@ const char *ColourOf(const std::string &word)
             return colour;
     return nullptr;
 }
-
-struct FreeTable {
-    void operator()(libscols_table *table) const { scols_unref_table(table); }
-};
 
 // A table of libsmartcols that is as wide as the terminal.
 class Grid {
@@ -135,7 +119,7 @@ class Grid {
     }
 
   private:
-    std::unique_ptr<libscols_table, FreeTable> table_;
+    std::unique_ptr<libscols_table, By<scols_unref_table>> table_;
 };
 
 }  // namespace

@@ -1,5 +1,7 @@
-// The terminal that standard output goes to.
+// The terminal that standard output or standard error goes to.
 #include "frame/terminal.h"
+
+#include "frame/text.h"
 
 #include <algorithm>
 #include <clocale>
@@ -31,6 +33,8 @@ bool IsSet(const char *name)
     const char *value = std::getenv(name);
     return value && *value;
 }
+
+constexpr char erase_line[] = "\r\x1b[K";
 
 }  // namespace
 
@@ -79,6 +83,26 @@ void Terminal::Page(const std::string &text)
     constexpr int no_such_program = 127;
     if (WIFEXITED(status) && WEXITSTATUS(status) == no_such_program)
         std::cout << text;
+}
+
+bool Progress::Visible()
+{
+    static const bool visible = ::isatty(STDERR_FILENO);
+    return visible;
+}
+
+void Progress::Show(const std::string &state)
+{
+    if (!Visible())
+        return;
+    std::cerr << erase_line << Printable(what_ + ": " + state) << std::flush;
+    shown_ = true;
+}
+
+Progress::~Progress()
+{
+    if (shown_)
+        std::cerr << erase_line << std::flush;
 }
 
 }  // namespace tavoctl

@@ -1,4 +1,4 @@
-// The terminal that standard output goes to, if it is one.
+// The terminal, if there is one: what standard output goes to, and the line about long work on standard error.
 #ifndef TAVOCTL_TERMINAL_H
 #define TAVOCTL_TERMINAL_H
 
@@ -19,6 +19,23 @@ class Terminal {
 
     // Prints the text, through $PAGER when it is longer than the terminal is high.
     static void Page(const std::string &text);
+};
+
+// One line on standard error about long work; nothing when that is not a terminal.
+class Progress {
+  public:
+    explicit Progress(std::string what) : what_(std::move(what)) {}
+    ~Progress();  // takes the line away
+    Progress(const Progress &) = delete;
+    Progress &operator=(const Progress &) = delete;
+
+    static bool Visible();
+    // "WHAT: state", in the place of what stood there.
+    void Show(const std::string &state);
+
+  private:
+    std::string what_;
+    bool shown_ = false;
 };
 
 }  // namespace tavoctl

@@ -35,15 +35,9 @@ std::vector<Edit> ShortestScript(const Lines &before, const Lines &after)
     const int n = static_cast<int>(before.size());
     const int m = static_cast<int>(after.size());
     const int limit = std::min(n + m, most_edits);
-    const auto left = [&](int i) {
-        return before[static_cast<std::size_t>(i)];
-    };
-    const auto right = [&](int i) {
-        return after[static_cast<std::size_t>(i)];
-    };
-    const auto index = [](int k, int d) {
-        return static_cast<std::size_t>(k + d + 1);
-    };
+    const auto left = [&](int i) { return before[static_cast<std::size_t>(i)]; };
+    const auto right = [&](int i) { return after[static_cast<std::size_t>(i)]; };
+    const auto index = [](int k, int d) { return static_cast<std::size_t>(k + d + 1); };
 
     std::vector<std::vector<int>> rounds;
     std::vector<int> best = {0, 0, 0};
@@ -104,9 +98,7 @@ std::string UnifiedDiff(std::string_view before, std::string_view after, const s
     if (before == after)
         return {};
     const std::vector<Edit> script = ShortestScript(Split(before), Split(after));
-    const auto changed = [](const Edit &edit) {
-        return edit.mark != ' ';
-    };
+    const auto changed = [](const Edit &edit) { return edit.mark != ' '; };
 
     std::string diff = "--- " + name_before + "\n+++ " + name_after + "\n";
     std::size_t line_before = 0;

@@ -13,16 +13,16 @@
 //
 // It is registered with its effect on the machine, its answer and its texts:
 //
-//     conf.Add("get", reads, Answer::One(setting_columns), R"(Prints the value of KEY.
+//     conf.Add("get", reads, Answer::One(setting_columns), ConfGet, R"(Prints the value of KEY.
 //
-//     tavoctl conf get runsamba)", ConfGet);
+//     tavoctl conf get runsamba)");
 //
-// docs/tavoctl.md has the whole of it.
+// docs/tavoctl.md has the whole of it. This header brings all that it takes: arguments, columns, tables and failures.
 #ifndef TAVOCTL_VERB_H
 #define TAVOCTL_VERB_H
 
 #include "frame/arguments.h"
-#include "frame/exit_status.h"
+#include "frame/failure.h"
 #include "frame/table.h"
 
 #include <functional>
@@ -71,13 +71,10 @@ struct Answer {
         return {form, columns, Facts(columns_of_one)};
     }
     static Answer Own(std::string (*schema)(), const char *page) { return {own, {}, {}, schema, page}; }
-    static Answer Change() { return {change, {}, {}}; }
     // A change of several things, each with its own result.
     static Answer Batch() { return {.form = change, .has_entries = true}; }
     static Answer Nothing() { return {nothing, {}, {}}; }
 };
-
-struct Failure;
 
 // How the verb was called: the common options, and how it answers.
 struct Call {

@@ -4,8 +4,6 @@
 #include <csignal>
 #include <ctime>
 #include <iostream>
-#include <optional>
-#include <string>
 
 #include <unistd.h>
 
@@ -20,9 +18,7 @@ volatile std::sig_atomic_t asked_to_end = 0;
 void EndOnRequest()
 {
     struct sigaction action = {};
-    action.sa_handler = [](int) {
-        asked_to_end = 1;
-    };
+    action.sa_handler = [](int) { asked_to_end = 1; };
     action.sa_flags = static_cast<int>(SA_RESETHAND);
     for (const int number : {SIGINT, SIGTERM})
         ::sigaction(number, &action, nullptr);

@@ -2,10 +2,7 @@
 #ifndef TAVOCTL_WATCH_H
 #define TAVOCTL_WATCH_H
 
-#include "frame/table.h"
 #include "frame/verb.h"
-
-#include <functional>
 
 namespace tavoctl {
 

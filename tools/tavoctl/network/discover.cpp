@@ -2,14 +2,11 @@
 #include "tavo_fhost.h"
 
 #include "families.h"
-#include "frame/failure.h"
-#include "frame/program.h"
-#include "frame/progress.h"
+#include "frame/terminal.h"
 
 #include <csignal>
 #include <iostream>
 #include <map>
-#include <vector>
 
 #include <unistd.h>
 
@@ -152,14 +149,13 @@ Action Discover(Arguments &in)
 void AddDiscover(Program &program)
 {
     program.Add("discover", "Other appliances on the network")
-        .Add("", reads, Answer::List(host_columns).OrOne(event_columns),
+        .Add("", reads, Answer::List(host_columns).OrOne(event_columns), Discover,
              R"(Lists the appliances that answer on the networks of the wired
 interfaces. It takes ten seconds to hear them all. What they say of themselves is not to be relied on.
 
 tavoctl discover
 tavoctl discover --json
-tavoctl discover --watch --json)",
-             Discover);
+tavoctl discover --watch --json)");
 }
 
 }  // namespace tavoctl

@@ -3,9 +3,7 @@
 
 #include "families.h"
 #include "frame/containers.h"
-#include "frame/failure.h"
-#include "frame/folder_names.h"
-#include "frame/program.h"
+#include "frame/files.h"
 #include "network/net_card.h"
 #include "network/net_document.h"
 #include "network/net_verbs.h"
@@ -61,31 +59,16 @@ struct CardFacts {
 };
 
 constexpr Column<CardFacts> card_columns[] = {
-    {"interface",
-     [](const CardFacts &c) {
-         return std::string(c.card.szInterface);
-     }},
+    {"interface", [](const CardFacts &c) { return std::string(c.card.szInterface); }},
     {"mode", [](const CardFacts &c) -> std::string { return c.card.nMode == TAVO_NET_DHCP ? "dhcp" : "static"; },
      "dhcp or static"},
-    {"address",
-     [](const CardFacts &c) {
-         return Maybe(c.card.szIp);
-     }},
-    {"mask",
-     [](const CardFacts &c) {
-         return Maybe(c.card.szMask);
-     }},
+    {"address", [](const CardFacts &c) { return Maybe(c.card.szIp); }},
+    {"mask", [](const CardFacts &c) { return Maybe(c.card.szMask); }},
     {"network", [](const CardFacts &c) { return Maybe(c.card.szNetwork); }, "", in_details},
     {"broadcast", [](const CardFacts &c) { return Maybe(c.card.szBroadcast); }, "", in_details},
-    {"mac",
-     [](const CardFacts &c) {
-         return Maybe(c.card.szMac);
-     }},
+    {"mac", [](const CardFacts &c) { return Maybe(c.card.szMac); }},
     {"mtu", [](const CardFacts &c) { return c.card.nMtu; }, "", in_list, "bytes"},
-    {"link",
-     [](const CardFacts &c) {
-         return c.card.fLink != 0;
-     }},
+    {"link", [](const CardFacts &c) { return c.card.fLink != 0; }},
     {"ipv6", [](const CardFacts &c) { return BlTAVONetIPv6IsEnabled(c.card.szInterface) == 1; }, "", in_details},
     {"ipv6_addresses", field<&CardFacts::ipv6_addresses>, "", in_details},
     {"wake_on_lan", field<&CardFacts::wake_on_lan>, "", in_details},
@@ -106,42 +89,25 @@ constexpr Column<AddressUse> address_columns[] = {
     {"used", field<&AddressUse::used>, "by another host"},
 };
 
-Cell PresentHostname()
-{
-    char name[64] = "";
-    return TAVOLnxGetHostname(name, sizeof name) == 0 ? Cell(name) : Cell();
-}
-
-std::vector<std::string> PresentServers()
-{
-    StringList servers;
-    TAVONetDNSGet(servers.Address());
-    return servers.Items();
-}
-
-std::optional<std::string> PresentGateway()
-{
-    char gateway[20] = "";
-    return TAVONetDefaultGatewayGet(gateway, sizeof gateway) == 0 ? Maybe(gateway) : std::nullopt;
-}
-
 NetFacts PresentNet()
 {
-    NetFacts facts = {{}, {}, PresentGateway(), PresentServers()};
+    NetFacts facts;
     char text[64] = "";
     if (TAVOLnxGetHostname(text, sizeof text) == 0)
         facts.hostname = text;
     if (TAVONetDefaultGatewayGetConf(text, sizeof text) == 0)
         facts.gateway = Maybe(text);
+    if (TAVONetDefaultGatewayGet(text, sizeof text) == 0)
+        facts.live_gateway = Maybe(text);
+    StringList servers;
+    TAVONetDNSGet(servers.Address());
+    facts.dns = servers.Items();
     return facts;
 }
 
 CardFacts FactsOf(const TAVONETCARD &card, const NetFacts &net)
 {
-    CardFacts facts = {card, net, {}, {}};
-    StringList list;
-    if (TAVONetIPv6AddrEnum(card.szInterface, list.Address()) >= 0)
-        facts.ipv6_addresses = list.Items();
+    CardFacts facts = {card, net, Ipv6Of(card.szInterface), {}};
     if (const int wakes = TAVONetWolGet(card.szInterface); wakes >= 0)
         facts.wake_on_lan = wakes == 1;
     return facts;
@@ -172,7 +138,7 @@ Action NetGateway(Arguments &in)
     const auto address = in.Text("ADDRESS", any_text, "of the router");
     return [=](Call &call) {
         // It is stored, too, so that the change is made in any case.
-        call.Change("network", "gateway", PresentGateway(), *address);
+        call.Change("network", "gateway", PresentNet().live_gateway, *address);
         if (!call.dry_run)
             Must(TAVONetDefaultGatewaySet(address->c_str()) == 0, "make " + *address + " the gateway",
                  "is it on the network of an interface?");
@@ -184,10 +150,10 @@ Action NetDns(Arguments &in)
     const auto none = in.Flag("--none", "no name server at all");
     const auto addresses = in.Texts("ADDRESS", any_text, "of a name server", 0);
     return [=](Call &call) {
-        if (*none != addresses->empty())
-            throw UsageFailure("set the name servers", *none ? "there are some, and --none" : "none was named",
-                               "name them in the order in which they are asked, or use --none");
-        call.Change("network", "dns", PresentServers(), *addresses);
+        RefuseIf(*none != addresses->empty(), "set the name servers",
+                 *none ? "there are some, and --none" : "none was named",
+                 "name them in the order in which they are asked, or use --none");
+        call.Change("network", "dns", PresentNet().dns, *addresses);
         if (call.Proceed())
             Must(TAVONetDNSSet(StringList(*addresses).Get()) == 0, "set the name servers",
                  "a name server is an IPv4 or IPv6 address");
@@ -198,7 +164,7 @@ Action NetHostname(Arguments &in)
 {
     const auto name = in.Text("NAME", any_text, "the new host name");
     return [=](Call &call) {
-        call.Change("network", "hostname", PresentHostname(), *name);
+        call.Change("network", "hostname", PresentNet().hostname, *name);
         if (!call.dry_run)
             Must(TAVOLnxSetHostname(name->c_str()) == 0, "name this appliance " + *name,
                  "allowed: 1 to 15 letters, digits, \"-\" and \"_\", with a letter first");
@@ -275,14 +241,14 @@ Action NetCheckPort(Arguments &in)
 void AddNet(Program &program)
 {
     Family &net = program.Add("net", "Interfaces, addresses, names and bonds");
-    net.Add("show", reads, Answer::List(card_columns).OrOne(card_columns), R"(Shows the host name, the gateway as it is
+    net.Add("show", reads, Answer::List(card_columns).OrOne(card_columns), NetShow,
+            R"(Shows the host name, the gateway as it is
 stored and as it is used, the name servers and the interfaces, or all about one of them.
 
 tavoctl net show
 tavoctl net show eth0
-tavoctl net show --json)",
-            NetShow);
-    net.Add("set", changes, Answer::Change(), R"(Sets the address of an interface: one from DHCP, or a static one. If
+tavoctl net show --json)");
+    net.Add("set", changes, NetSet, R"(Sets the address of an interface: one from DHCP, or a static one. If
 you reach the appliance by that very interface, use --try: unless the new settings are confirmed in time, here or with
 `tavoctl net confirm` from another connection, the old ones come back, also when this command has ended with its
 connection. A static address is taken only when no other host answers for it.
@@ -290,94 +256,78 @@ connection. A static address is taken only when no other host answers for it.
 tavoctl net set dhcp
 tavoctl net set 192.0.2.10/24 --gateway 192.0.2.1
 tavoctl net set --interface eth1 192.0.2.10/255.255.255.0
-tavoctl net set --try 60 192.0.2.20/24)",
-            NetSet);
-    net.Add("export", reads, Answer::Own(NetDocumentSchema, "network.md"),
+tavoctl net set --try 60 192.0.2.20/24)");
+    net.Add("export", reads, Answer::Own(NetDocumentSchema, "network.md"), NetExport,
             R"(Writes the whole network as a JSON document, in
 the form that apply reads.
 
 tavoctl net export
-tavoctl net export >network.json)",
-            NetExport);
-    net.Add("apply", changes, Answer::Change(),
-            R"(Brings the network to what a JSON document says. What is so already is
+tavoctl net export >network.json)");
+    net.Add("apply", changes, NetApply, R"(Brings the network to what a JSON document says. What is so already is
 not touched, and what the document does not speak of stays. When a step fails everything is as it was. --try puts
 the old network back unless it is confirmed in time.
 
 tavoctl net apply --dry-run network.json
-tavoctl net apply --try 60 network.json)",
-            NetApply);
-    net.Add("confirm", changes, Answer::Change(), R"(Keeps the settings that `tavoctl net set --try` or
+tavoctl net apply --try 60 network.json)");
+    net.Add("confirm", changes, NetConfirm, R"(Keeps the settings that `tavoctl net set --try` or
 `tavoctl net apply --try` has on trial.
 
-tavoctl net confirm)",
-            NetConfirm);
-    net.Add("gateway", changes, Answer::Change(), R"(Makes ADDRESS the default gateway and stores it. When it cannot be
+tavoctl net confirm)");
+    net.Add("gateway", changes, NetGateway, R"(Makes ADDRESS the default gateway and stores it. When it cannot be
 reached from any interface the old one stays.
 
-tavoctl net gateway 192.0.2.1)",
-            NetGateway);
-    net.Add("dns", changes, Answer::Change(), R"(Replaces the name servers, in the order in which they are asked.
+tavoctl net gateway 192.0.2.1)");
+    net.Add("dns", changes, NetDns, R"(Replaces the name servers, in the order in which they are asked.
 
 tavoctl net dns 192.0.2.53 2001:db8::53
-tavoctl net dns --none)",
-            NetDns);
-    net.Add("hostname", changes, Answer::Change(), R"(Renames the appliance: in the kernel, in the stored
+tavoctl net dns --none)");
+    net.Add("hostname", changes, NetHostname, R"(Renames the appliance: in the kernel, in the stored
 settings and in /etc/hosts. 1 to 15 letters, digits, "-" and "_".
 
-tavoctl net hostname attic)",
-            NetHostname);
-    net.Add("mtu", changes, Answer::Change(), R"(Sets and stores the MTU of an interface.
+tavoctl net hostname attic)");
+    net.Add("mtu", changes, NetMtu, R"(Sets and stores the MTU of an interface.
 
-tavoctl net mtu eth0 9000)",
-            NetMtu);
-    net.Add("check-address", reads, Answer::One(address_columns),
+tavoctl net mtu eth0 9000)");
+    net.Add("check-address", reads, Answer::One(address_columns), NetCheckAddress,
             R"(Checks whether another host uses ADDRESS: "free", or
 "used" with exit status 4. It asks by ping and, when called by root, by ARP (RFC 5227), which hosts that answer no ping
 answer, too. The appliance's own address is free.
 
 tavoctl net check-address 192.0.2.20
-tavoctl net check-address --interface eth1 192.0.2.20)",
-            NetCheckAddress);
-    net.Add("check-port", reads, Answer::One(port_columns), R"(Checks whether a program on this appliance uses a TCP or
+tavoctl net check-address --interface eth1 192.0.2.20)");
+    net.Add("check-port", reads, Answer::One(port_columns), NetCheckPort,
+            R"(Checks whether a program on this appliance uses a TCP or
 UDP port: "free", or "used" with exit status 4.
 
-tavoctl net check-port 5000)",
-            NetCheckPort);
-    net.Add("refresh", changes, Answer::Change(), R"(Puts back what a program that died in the middle of a change has
+tavoctl net check-port 5000)");
+    net.Add("refresh", changes, NetRefresh, R"(Puts back what a program that died in the middle of a change has
 left, and brings the appliance's name in /etc/hosts up to date. Never waits: it leaves both to a program that is changing
 the network just now. The start of the network and the DHCP client's hook run it.
 
-tavoctl net refresh)",
-            NetRefresh);
-    net.Add("ipv6", changes, Answer::Change(), R"(Switches IPv6 on an interface on or off, or gives it an address or,
+tavoctl net refresh)");
+    net.Add("ipv6", changes, NetIpv6, R"(Switches IPv6 on an interface on or off, or gives it an address or,
 with --remove, takes one away.
 
 tavoctl net ipv6 eth0 off
 tavoctl net ipv6 eth0 2001:db8::10/64
 tavoctl net ipv6 eth0 2001:db8::10/64 --gateway 2001:db8::1
-tavoctl net ipv6 --remove eth0 2001:db8::10/64)",
-            NetIpv6);
-    net.Add("wol", changes, Answer::Change(),
-            R"(Allows or forbids an interface to wake the appliance. On which packets is set
+tavoctl net ipv6 --remove eth0 2001:db8::10/64)");
+    net.Add("wol", changes, NetWol, R"(Allows or forbids an interface to wake the appliance. On which packets is set
 by wol_enabled_options in /etc/tavoinfo.conf.
 
-tavoctl net wol eth0 on)",
-            NetWol);
-    net.Add("bonds", reads, Answer::List(bond_columns), R"(Lists the bonds: their mode, their members, and the switch at
+tavoctl net wol eth0 on)");
+    net.Add("bonds", reads, Answer::List(bond_columns), NetBonds,
+            R"(Lists the bonds: their mode, their members, and the switch at
 the other end of an 802.3ad one.
 
-tavoctl net bonds)",
-            NetBonds);
-    net.Add("bond", changes | destroys, Answer::Change(),
-            R"(Makes a bond of interfaces, changes it, or dissolves it (mode
+tavoctl net bonds)");
+    net.Add("bond", changes | destroys, NetBond, R"(Makes a bond of interfaces, changes it, or dissolves it (mode
 "none"). The network is stopped meanwhile. lacp is 802.3ad and wants a switch that knows it; adaptive spreads the load
 by itself; backup uses one card at a time.
 
 tavoctl net bond backup eth0 eth1
 tavoctl net bond --name bond0 lacp eth0 eth1
-tavoctl net bond --yes none)",
-            NetBond);
+tavoctl net bond --yes none)");
 }
 
 }  // namespace tavoctl

@@ -4,13 +4,11 @@
 #include "tavo_lock.h"
 #include "tavo_net.h"
 
-#include "frame/failure.h"
+#include "frame/files.h"
 #include "frame/held_locks.h"
-#include "frame/input_file.h"
 #include "network/net_card.h"
 #include "network/net_change.h"
 #include "network/net_present.h"
-#include "network/net_steps.h"
 #include "network/net_text.h"
 #include "network/net_verbs.h"
 
@@ -149,11 +147,10 @@ void RefuseWhatIsNotKept(const std::vector<NetDifference> &differences)
             continue;
         if (!features)
             features = Features();
-        if (!features->contains(one.item->feature))
-            throw Failure{.attempted = "change " + one.card + (one.card.empty() ? "" : ".") + one.item->name,
-                          .reason = "/etc/rc.network would not keep it over a restart",
-                          .hint = "its \"features\" do not name " + std::string(one.item->feature),
-                          .status = exit_failed};
+        FailIf(!features->contains(one.item->feature),
+               "change " + one.card + (one.card.empty() ? "" : ".") + one.item->name,
+               "/etc/rc.network would not keep it over a restart",
+               "its \"features\" do not name " + std::string(one.item->feature));
     }
 }
 
@@ -172,12 +169,10 @@ void RefuseUsedAddresses(const std::vector<NetDifference> &differences)
         const NetFactsMap live = LiveCard(one.card, "static");
         std::vector<std::string> own = TextsOf(live, "more_addresses");
         own.push_back(TextOf(live, "address"));
-        const auto plain = [](const std::string &address) {
-            return address.substr(0, address.find('/'));
-        };
         for (const std::string &address : wanted)
-            if (std::none_of(own.begin(), own.end(), [&](const auto &has) { return plain(has) == plain(address); }))
-                RefuseUsedAddress(card, plain(address));
+            if (std::none_of(own.begin(), own.end(),
+                             [&](const auto &has) { return PlainAddress(has) == PlainAddress(address); }))
+                RefuseUsedAddress(card, PlainAddress(address));
     }
 }
 

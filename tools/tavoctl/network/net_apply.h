@@ -5,11 +5,6 @@
 #include "frame/verb.h"
 #include "network/net_document.h"
 
-#include <cstdint>
-#include <optional>
-#include <string>
-#include <vector>
-
 namespace tavoctl {
 
 // A fact of the document that the network does not have yet, in its files or in the kernel.

@@ -8,8 +8,7 @@ namespace tavoctl {
 TAVONETCARD FirstCard(const std::string &attempted)
 {
     TAVONETCARD card = {};
-    if (TAVONetGetCard1(&card) != 0)
-        throw LibraryFailure(attempted, "is there a wired interface at all?");
+    Must(TAVONetGetCard1(&card) == 0, attempted, "is there a wired interface at all?");
     return card;
 }
 
@@ -39,8 +38,7 @@ void RefuseUsedAddress(const TAVONETCARD &card, const std::string &address)
     const std::string attempted = "take the address " + address;
     const int used = TAVONetAddressProbe(card.szInterface, address.c_str(), probe_milliseconds);
     Must(used >= 0, attempted, "--no-probe takes it without asking");
-    if (used == 1)
-        throw BusyFailure(attempted, "another host uses it", "--no-probe takes it anyway");
+    BusyIf(used == 1, attempted, "another host uses it", "--no-probe takes it anyway");
 }
 
 }  // namespace tavoctl

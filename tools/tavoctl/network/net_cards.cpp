@@ -2,13 +2,11 @@
 #include "tavo_net.h"
 
 #include "frame/containers.h"
-#include "frame/failure.h"
+#include "frame/text.h"
 #include "network/net_card.h"
 #include "network/net_verbs.h"
 
 #include <algorithm>
-#include <charconv>
-#include <cstring>
 #include <iterator>
 
 namespace tavoctl {
@@ -18,12 +16,7 @@ namespace {
 bool IsIpv6Change(const std::string &what)
 {
     const std::size_t slash = what.find('/');
-    if (slash == what.npos)
-        return what == "on" || what == "off";
-    int length = -1;
-    const char *const end = what.data() + what.size();
-    const auto [stop, error] = std::from_chars(what.data() + slash + 1, end, length);
-    return error == std::errc() && stop == end;
+    return slash == what.npos ? what == "on" || what == "off" : NumberIn<int>(what.substr(slash + 1)).has_value();
 }
 
 constexpr ArgumentKind ipv6_kind = {
@@ -38,8 +31,6 @@ constexpr ArgumentKind ipv6_kind = {
     .wrong = "maybe",
 };
 
-constexpr const char *modes[] = {"none", "lacp", "adaptive", "backup"};  // in the order of TAVONETLINKAGGR.nMode
-
 std::vector<std::string> MembersOfBond(const std::string &bond)
 {
     StringList members;
@@ -47,13 +38,13 @@ std::vector<std::string> MembersOfBond(const std::string &bond)
     return members.Items();
 }
 
+}  // namespace
+
 std::vector<std::string> Ipv6Of(const std::string &interface)
 {
     StringList list;
     return TAVONetIPv6AddrEnum(interface.c_str(), list.Address()) < 0 ? std::vector<std::string>() : list.Items();
 }
-
-}  // namespace
 
 Action NetIpv6(Arguments &in)
 {
@@ -121,7 +112,7 @@ Action NetBonds(Arguments &)
             facts.push_back({bond, {}, MembersOfBond(bond), {}});
             if (TAVONetLinkAggrGet(bond.c_str(), &record) != 0)
                 continue;  // a mode that the appliance does not offer
-            facts.back().mode = modes[record.nMode];
+            facts.back().mode = bond_modes[record.nMode];
             facts.back().partner = Maybe(record.szPartner);
         }
         call.List(bond_columns, facts);
@@ -131,17 +122,18 @@ Action NetBonds(Arguments &)
 Action NetBond(Arguments &in)
 {
     const auto bond = in.Option("--name", "BOND", interface_kind, "the bond (bond0)");
-    const auto mode = in.Choice("MODE", {std::begin(modes), std::end(modes)}, "lacp, adaptive, backup, or none");
+    const auto mode =
+        in.Choice("MODE", {std::begin(bond_modes), std::end(bond_modes)}, "lacp, adaptive, backup, or none");
     const auto members = in.Texts("INTERFACE", interface_kind, "its members, in their order", 0);
     return [=](Call &call) {
         const std::string name = bond->value_or("bond0");
         const std::string attempted = "change " + name;
         TAVONETLINKAGGR record = {};
         Put(record.szBond, name);
-        const auto *found = std::find(std::begin(modes), std::end(modes), *mode);
-        record.nMode = static_cast<int32_t>(found - std::begin(modes));
-        if ((record.nMode == TAVO_NET_AGGR_NONE) != members->empty())
-            throw UsageFailure(attempted, members->empty() ? "it has no members" : "a dissolved bond has no members");
+        const auto *found = std::find(std::begin(bond_modes), std::end(bond_modes), *mode);
+        record.nMode = static_cast<int32_t>(found - std::begin(bond_modes));
+        RefuseIf((record.nMode == TAVO_NET_AGGR_NONE) != members->empty(), attempted,
+                 members->empty() ? "it has no members" : "a dissolved bond has no members");
         for (const std::string &member : *members)
             Must(TAVONetLinkAggrOptSlsaveAdd(&record, member.c_str()) == 0, "take " + member + " into " + name,
                  HintFor{ERR_LINK_AGGR_TYPE, "it is not an Ethernet card"});

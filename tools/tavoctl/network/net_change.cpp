@@ -9,10 +9,8 @@
 #include <algorithm>
 #include <cerrno>
 #include <csignal>
-#include <cstdio>
 #include <ctime>
 #include <iostream>
-#include <utility>
 
 #include <fcntl.h>
 #include <poll.h>
@@ -161,8 +159,7 @@ bool Insist(int (*end)())
 int OpenPidFile()
 {
     const int fd = ::open(pid_file, O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0644);
-    if (fd < 0)
-        throw Failure{.attempted = std::string("write ") + pid_file, .reason = "it cannot be opened"};
+    FailIf(fd < 0, std::string("write ") + pid_file, "it cannot be opened");
     struct stat held, named;
     if (::flock(fd, LOCK_EX | LOCK_NB) == 0 && ::fstat(fd, &held) == 0 && ::stat(pid_file, &named) == 0 &&
         held.st_ino == named.st_ino)
@@ -177,8 +174,8 @@ int OpenPidFile()
 void WritePid(int fd, pid_t pid)
 {
     const std::string text = std::to_string(pid) + "\n";
-    if (::ftruncate(fd, 0) != 0 || ::pwrite(fd, text.data(), text.size(), 0) != static_cast<ssize_t>(text.size()))
-        throw Failure{.attempted = std::string("write ") + pid_file, .reason = "the disk is full"};
+    FailIf(::ftruncate(fd, 0) != 0 || ::pwrite(fd, text.data(), text.size(), 0) != static_cast<ssize_t>(text.size()),
+           std::string("write ") + pid_file, "the disk is full");
 }
 
 }  // namespace
@@ -187,11 +184,9 @@ NetChange::NetChange(int seconds) : seconds_(seconds)
 {
     const int pid_fd = OpenPidFile();
     int line[2];
-    if (::socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, line) != 0)
-        throw Failure{.attempted = question, .reason = "no socket can be created"};
+    FailIf(::socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, line) != 0, question, "no socket can be created");
     const pid_t pid = ::fork();
-    if (pid < 0)
-        throw Failure{.attempted = question, .reason = "no process can be started"};
+    FailIf(pid < 0, question, "no process can be started");
     if (pid == 0) {
         ::close(line[0]);
         try {
@@ -226,18 +221,14 @@ void NetChange::Make(const std::optional<int64_t> &seconds, const std::function<
     try {
         change();
     } catch (Failure &failure) {
-        failure.hint += std::string(failure.hint.empty() ? "" : "; ") +
-                        (trial.GiveUp() ? "the old settings are back" : "the old settings could not be put back");
+        failure.AddHint(trial.GiveUp() ? "the old settings are back" : "the old settings could not be put back");
         throw;
     }
     if (seconds)
         trial.Begin();
     else
         Say(trial.guardian_, keep);
-    if (!trial.IsKept())
-        throw Failure{.attempted = "keep the new settings",
-                      .reason = "they were not confirmed, the old ones are back",
-                      .status = exit_failed};
+    FailIf(!trial.IsKept(), "keep the new settings", "they were not confirmed, the old ones are back");
 }
 
 void NetChange::Begin()
@@ -271,20 +262,15 @@ bool NetChange::IsKept()
     const char verdict = Hear(guardian_);
     if (asks && verdict != kept)
         std::cerr << "\n";
-    if (verdict == failed)
-        throw Failure{.attempted = seconds_ > 0 ? "put the old settings back" : "keep the new settings",
-                      .reason = "the library refuses",
-                      .hint = "tavoctl net show tells what is there now"};
+    FailIf(verdict == failed, seconds_ > 0 ? "put the old settings back" : "keep the new settings",
+           "the library refuses", "tavoctl net show tells what is there now");
     return verdict == kept;
 }
 
 void NetChange::Confirm()
 {
-    if (TLIBProcSignalByPidFile(pid_file, SIGUSR1) != 0)
-        throw Failure{.attempted = "keep the new settings",
-                      .reason = "none are on trial",
-                      .hint = "the old ones are back, or the new ones are confirmed already",
-                      .status = exit_not_found};
+    FailIf(TLIBProcSignalByPidFile(pid_file, SIGUSR1) != 0, "keep the new settings", "none are on trial",
+           "the old ones are back, or the new ones are confirmed already", exit_not_found);
     for (int i = 0; i < 500; ++i) {
         if (::access(pid_file, F_OK) != 0)
             return;

@@ -139,9 +139,7 @@ void TakeFact(const std::vector<NetItem> &items, const std::string &name, const 
 // Checks across several fields.
 void CheckCard(const std::string &place, NetFactsMap &card)
 {
-    const auto has = [&](const char *name) {
-        return card.contains(name);
-    };
+    const auto has = [&](const char *name) { return card.contains(name); };
     if (has("bond") != has("members"))
         Refuse(place, "a bond has both bond and members");
     if (has("members") && (TextsOf(card, "members").empty() || TextsOf(card, "members").size() > 8))
@@ -198,15 +196,12 @@ void CheckDocument(const NetDocument &document)
         if (const auto [user, fresh] = users.try_emplace(what, card); !fresh)
             Refuse("card " + card, what + " is also that of " + user->second);
     };
-    const auto plain = [](const std::string &address) {
-        return address.substr(0, address.find('/'));
-    };
     for (const auto &[name, card] : document.cards) {
         if (IsGiven(card, "address"))
-            claim(plain(TextOf(card, "address")), name);
+            claim(PlainAddress(TextOf(card, "address")), name);
         for (const char *list : {"more_addresses", "ipv6_addresses"})
             for (const std::string &address : TextsOf(card, list))
-                claim(plain(address), name);
+                claim(PlainAddress(address), name);
         for (const std::string &member : TextsOf(card, "members")) {
             claim(member, name);
             const auto own = document.cards.find(member);
@@ -224,26 +219,11 @@ void CheckDocument(const NetDocument &document)
     }
 }
 
-Json JsonOf(const Cell &cell)
-{
-    return std::visit(
-        [](const auto &value) -> Json {
-            using Value = std::decay_t<decltype(value)>;
-            if constexpr (std::same_as<Value, std::monostate>)
-                return nullptr;
-            else if constexpr (std::same_as<Value, Bytes>)
-                return value.count;
-            else
-                return value;
-        },
-        cell.Get());
-}
-
 void PutFacts(const std::vector<NetItem> &items, const NetFactsMap &facts, Json &object)
 {
     for (const NetItem &item : items)
         if (const auto fact = facts.find(item.name); fact != facts.end())
-            object[item.name] = JsonOf(fact->second);
+            object[item.name] = ToJson(fact->second);
 }
 
 Json SchemaOf(const std::vector<NetItem> &items)

@@ -49,6 +49,10 @@ NetDocument ParseNetDocument(const std::string &text);
 
 std::string JsonOf(const NetDocument &document);
 
+// Changes what differs, in the files and in the kernel; throws a Failure at the first thing that fails. The caller holds
+// the network lock and puts back.
+void ApplyNet(const NetDocument &wanted);
+
 // The JSON Schema of a document.
 std::string NetDocumentSchema();
 

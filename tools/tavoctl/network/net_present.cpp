@@ -4,15 +4,13 @@
 #include "tavo_file.h"
 #include "tavo_net.h"
 
-#include "frame/arguments.h"
 #include "frame/containers.h"
-#include "frame/failure.h"
-#include "frame/input_file.h"
+#include "frame/files.h"
+#include "frame/text.h"
 #include "network/net_text.h"
 #include "network/net_verbs.h"
 
 #include <algorithm>
-#include <charconv>
 #include <cstring>
 #include <iterator>
 #include <sstream>
@@ -42,15 +40,12 @@ std::vector<Words> Rows(const std::string &path)
 
 std::string Attribute(const std::string &interface, const char *name)
 {
-    std::string text = FileText("/sys/class/net/" + interface + "/" + name);
-    return text.substr(0, text.find('\n'));
+    return KernelText("/sys/class/net/" + interface + "/" + name).value_or("");
 }
 
 unsigned Hex(const std::string &text)
 {
-    unsigned value = 0;
-    std::from_chars(text.data(), text.data() + text.size(), value, 16);
-    return value;
+    return NumberIn<unsigned>(text, 16).value_or(0);
 }
 
 std::string Ipv4OfHex(const std::string &text)
@@ -143,7 +138,7 @@ Ipv6Live Ipv6Routes(const std::string &interface, const Words &addresses)
         }
         const bool own = !routed && std::any_of(addresses.begin(), addresses.end(), [&](const std::string &one) {
             in6_addr address = {};
-            ::inet_pton(AF_INET6, one.substr(0, one.find('/')).c_str(), &address);
+            ::inet_pton(AF_INET6, PlainAddress(one).c_str(), &address);
             const unsigned length = Hex(row[1]);
             for (unsigned bit = length; bit < 128; ++bit)
                 address.s6_addr[bit / 8] = static_cast<uint8_t>(address.s6_addr[bit / 8] & ~(0x80u >> bit % 8));
@@ -166,8 +161,6 @@ std::pair<std::string, int> VlanOf(const std::string &interface)
             return {row[4], std::atoi(row[2].c_str())};
     return {};
 }
-
-constexpr const char *bond_modes[] = {"none", "lacp", "adaptive", "backup"};  // in the order of TAVONETLINKAGGR.nMode
 
 void PutBond(const std::string &interface, NetFactsMap &card)
 {

@@ -1,12 +1,9 @@
 // tavoctl net set: the address of an interface, on trial or for good.
 #include "tavo_net.h"
 
-#include "frame/failure.h"
 #include "network/net_card.h"
 #include "network/net_change.h"
 #include "network/net_verbs.h"
-
-#include <functional>
 
 namespace tavoctl {
 namespace {

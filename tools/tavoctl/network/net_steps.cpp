@@ -1,6 +1,4 @@
 // The steps from the network as it is to that of a document.
-#include "network/net_steps.h"
-
 #include "tavo_file.h"
 #include "tavo_net.h"
 #include "tavo_proc.h"
@@ -8,7 +6,8 @@
 #include "frame/arguments.h"
 #include "frame/containers.h"
 #include "frame/failure.h"
-#include "frame/input_file.h"
+#include "frame/files.h"
+#include "frame/text.h"
 #include "network/net_card.h"
 #include "network/net_present.h"
 #include "network/net_text.h"
@@ -26,8 +25,7 @@ namespace {
 // The words come from texts that were checked: no character of them means something to a shell.
 void Run(const std::string &command, const std::string &attempted)
 {
-    if (TLIBSystem((command + " > /dev/null 2>&1").c_str()) != 0)
-        throw Failure{.attempted = attempted, .reason = "\"" + command + "\" failed", .status = exit_failed};
+    FailIf(TLIBSystem((command + " > /dev/null 2>&1").c_str()) != 0, attempted, "\"" + command + "\" failed");
 }
 
 Words Minus(const Words &all, const Words &others)
@@ -41,11 +39,6 @@ Words Minus(const Words &all, const Words &others)
 bool IsIpv6(const std::string &text)
 {
     return text.find(':') != text.npos;
-}
-
-std::string Before(const std::string &text, char sign)
-{
-    return text.substr(0, text.find(sign));
 }
 
 int LengthIn(const std::string &text)
@@ -79,6 +72,16 @@ std::string MaskOfLength(int length)
     return text;
 }
 
+// The start script passes over a card without a file.
+void MakeFile(const std::string &name)
+{
+    const std::string file = InterfaceFileOf(name);
+    SetKey(file, "DEVICE", name);
+    SetKey(file, "ONBOOT", "yes");
+    if (NetSetting(file, "BOOTPROTO").empty())
+        SetKey(file, "BOOTPROTO", "none");
+}
+
 // --- interfaces that a document makes and removes ---
 
 void SetBond(const std::string &name, int mode, const Words &members)
@@ -99,10 +102,7 @@ void SetVlan(const std::string &name, const std::string &parent, int number)
         return;
     more.parent = parent;
     more.vlan = number;
-    SetKey(InterfaceFileOf(name), "DEVICE", name);
-    SetKey(InterfaceFileOf(name), "ONBOOT", "yes");
-    if (NetSetting(InterfaceFileOf(name), "BOOTPROTO").empty())
-        SetKey(InterfaceFileOf(name), "BOOTPROTO", "none");
+    MakeFile(name);
     ReplaceFile(net_folder + ("more-" + name), more.Text());
     if (Exists(name))
         Run("/sbin/ip link del " + name, "remove " + name);
@@ -176,17 +176,12 @@ class CardSteps {
         return live.contains(fact) && !(live.at(fact) == want->second);
     }
 
-    // The start script passes over a card without a file.
     void Begin() const
     {
-        const std::string file = InterfaceFileOf(name_);
-        if (!NetSetting(file, "DEVICE").empty() ||
+        if (!NetSetting(InterfaceFileOf(name_), "DEVICE").empty() ||
             std::none_of(wanted_.begin(), wanted_.end(), [&](const auto &fact) { return Wants(fact.first.c_str()); }))
             return;
-        SetKey(file, "DEVICE", name_);
-        SetKey(file, "ONBOOT", "yes");
-        if (NetSetting(file, "BOOTPROTO").empty())
-            SetKey(file, "BOOTPROTO", "none");
+        MakeFile(name_);
         Run("/sbin/ifconfig " + name_ + " up", "start " + name_);
     }
 
@@ -209,7 +204,7 @@ class CardSteps {
         Put(card.szInterface, name_);
         card.nMode = mode == "dhcp" ? TAVO_NET_DHCP : TAVO_NET_STATIC;
         if (mode == "static") {
-            Put(card.szIp, Before(address, '/'));
+            Put(card.szIp, PlainAddress(address));
             Put(card.szMask, MaskOfLength(LengthIn(address)));
         }
         Must(TAVONetSetCard1(&card, before.szIp[0] ? &before : nullptr) == 0,
@@ -225,8 +220,7 @@ class CardSteps {
             ::unlink(client.c_str());
         }
         Run("/sbin/ifconfig " + name_ + " 0.0.0.0 up", "take the address of " + name_ + " away");
-        SetKey(file, "DEVICE", name_);
-        SetKey(file, "ONBOOT", "yes");
+        MakeFile(name_);
         SetKey(file, "BOOTPROTO", "none");
         for (const char *key : {"IPADDR", "NETMASK", "BROADCAST", "NETWORK"})
             RemoveKey(file, key);
@@ -246,7 +240,7 @@ class CardSteps {
             Run("/sbin/ip addr del " + first + " dev " + name_, "make " + first + " the first address of " + name_);
         if (wanted_.contains("ipv6_addresses"))
             for (const std::string &one : Minus(TextsOf(live, "ipv6_addresses"), TextsOf(wanted_, "ipv6_addresses")))
-                Must(TAVONetIPv6AddrDel(name_.c_str(), Before(one, '/').c_str(), LengthIn(one)) == 0,
+                Must(TAVONetIPv6AddrDel(name_.c_str(), PlainAddress(one).c_str(), LengthIn(one)) == 0,
                      "take " + one + " from " + name_);
     }
 
@@ -258,7 +252,7 @@ class CardSteps {
             Run("/sbin/ip addr add " + one + " dev " + name_, "give " + name_ + " the address " + one);
         if (wanted_.contains("ipv6_addresses"))
             for (const std::string &one : Minus(TextsOf(wanted_, "ipv6_addresses"), TextsOf(Live(), "ipv6_addresses")))
-                Must(TAVONetIPv6AddrAdd(name_.c_str(), Before(one, '/').c_str(), LengthIn(one)) == 0,
+                Must(TAVONetIPv6AddrAdd(name_.c_str(), PlainAddress(one).c_str(), LengthIn(one)) == 0,
                      "give " + name_ + " the address " + one);
     }
 
@@ -311,7 +305,7 @@ class CardSteps {
             const std::string file = InterfaceFileOf(name_);
             Words ipv6 = TextsOf(wanted_, "ipv6_addresses");
             if (!ipv6.empty()) {
-                SetKey(file, "IPV6ADDR", Before(ipv6.front(), '/'));
+                SetKey(file, "IPV6ADDR", PlainAddress(ipv6.front()));
                 SetKey(file, "IPV6PREFIXLENG", std::to_string(LengthIn(ipv6.front())));
                 ipv6.erase(ipv6.begin());
             } else {
@@ -352,18 +346,10 @@ void SetGateway(const NetFactsMap &wanted)
     }
 }
 
-std::string JoinedWords(const Words &words)
-{
-    std::string text;
-    for (const std::string &word : words)
-        text += (text.empty() ? "" : " ") + word;
-    return text;
-}
-
 // The library replaces the whole file when it sets the servers.
 void KeepSearch(const Words &search)
 {
-    std::string text = search.empty() ? "" : "search " + JoinedWords(search) + "\n";
+    std::string text = search.empty() ? "" : "search " + Joined(search, " ") + "\n";
     std::istringstream lines(FileText(resolver_file));
     for (std::string line; std::getline(lines, line);)
         if (!line.starts_with("search") && !line.starts_with("domain"))
@@ -390,7 +376,7 @@ void ApplyWhole(const NetFactsMap &wanted)
         Must(TAVONetDNSSet(StringList(TextsOf(wanted, "dns")).Get()) == 0, "set the name servers");
     if (wants("search")) {
         const Words search = TextsOf(wanted, "search");
-        ReplaceFile(search_file, search.empty() ? "" : JoinedWords(search) + "\n");
+        ReplaceFile(search_file, search.empty() ? "" : Joined(search, " ") + "\n");
     }
     if (wants("search") || wants("dns"))
         KeepSearch(TextsOf(StoredNet().net, "search"));

@@ -3,9 +3,10 @@
 
 #include "tavo_net.h"
 
+#include "frame/text.h"
+
 #include <algorithm>
 #include <bit>
-#include <charconv>
 
 #include <arpa/inet.h>
 #include <net/if.h>
@@ -16,11 +17,8 @@ namespace {
 // Strict: no sign, no blank, no leading zero.
 std::optional<unsigned> Length(const std::string &text, unsigned most)
 {
-    unsigned length = 0;
-    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), length);
-    if (error != std::errc() || end != text.data() + text.size() || length > most || std::to_string(length) != text)
-        return std::nullopt;
-    return length;
+    const auto length = NumberIn<unsigned>(text);
+    return length && *length <= most && std::to_string(*length) == text ? length : std::nullopt;
 }
 
 std::optional<uint32_t> Word(const std::string &text)
@@ -169,6 +167,11 @@ NormalText NormalBondMode(const std::string &text)
 NormalText NormalCardMode(const std::string &text)
 {
     return text == "dhcp" || text == "static" || text == "none" ? NormalText(text) : std::nullopt;
+}
+
+std::string PlainAddress(const std::string &address)
+{
+    return address.substr(0, address.find('/'));
 }
 
 int LengthOfMask(const std::string &mask)

@@ -21,6 +21,9 @@ NormalText NormalInterface(const std::string &text);
 NormalText NormalBondMode(const std::string &text);
 NormalText NormalCardMode(const std::string &text);
 
+// "192.0.2.10" of "192.0.2.10/24".
+std::string PlainAddress(const std::string &address);
+
 // The length of a mask such as 255.255.255.0.
 int LengthOfMask(const std::string &mask);
 

@@ -9,6 +9,7 @@ namespace tavoctl {
 // The network interfaces of the kernel, without the loopback.
 std::vector<std::string> InterfaceNames();
 
+std::vector<std::string> Ipv6Of(const std::string &interface);  // its addresses
 extern const ArgumentKind interface_kind;
 inline constexpr char interface_help[] = "such as eth0";
 
@@ -30,6 +31,9 @@ Action NetIpv6(Arguments &in);
 Action NetWol(Arguments &in);
 Action NetBonds(Arguments &in);
 Action NetBond(Arguments &in);
+
+// In the order of TAVONETLINKAGGR.nMode.
+inline constexpr const char *bond_modes[] = {"none", "lacp", "adaptive", "backup"};
 
 struct BondFacts {
     std::string bond;

@@ -1,14 +1,11 @@
 // tavoctl service: the state of the services.
-#include "service/service.h"
 
 #include "tavo_lock.h"
 #include "tavo_service.h"
 
 #include "families.h"
 #include "frame/containers.h"
-#include "frame/failure.h"
 #include "frame/held_locks.h"
-#include "frame/program.h"
 #include "frame/watch.h"
 #include "service/service_state.h"
 
@@ -83,69 +80,22 @@ Action ServiceStatus(Arguments &in)
 void AddService(Program &program)
 {
     Family &service = program.Add("service", "The appliance's services");
-    service.Add("list", reads, Answer::List(service_columns), R"(Lists the services that this model has. Shows whether
+    service.Add("list", reads, Answer::List(service_columns), ServiceList,
+                R"(Lists the services that this model has. Shows whether
 each is enabled and running, the process and since when, its data folders and the volumes where they are. "bound" says
 whether all of them are there.
 
 tavoctl service list
 tavoctl service list --all --json
 tavoctl service list --volume /volume1
-tavoctl service list --watch --interval 5)",
-                ServiceList);
-    service.Add("status", reads, Answer::One(service_columns), R"(Describes one service. "on" is the library's answer:
+tavoctl service list --watch --interval 5)");
+    service.Add("status", reads, Answer::One(service_columns), ServiceStatus,
+                R"(Describes one service. "on" is the library's answer:
 enabled, its data folders there, and running. The exit status is 3 when it is not running.
 
 tavoctl service status samba
-tavoctl service status --json ftp)",
-                ServiceStatus);
-    service.Add("enable", changes, Answer::Change(), R"(Enables services. Binds their data folders, on the volume where
-they are or else on the one with the most free space, sets their keys and starts them. Refuses a service whose data is
-on a volume that is not mounted.
-
-tavoctl service enable samba
-tavoctl service enable --wait 10 ftp ssh
-tavoctl service enable --dry-run media)",
-                ServiceEnable);
-    service.Add("disable", changes, Answer::Change(), R"(Disables services. Sets their keys, stops them and releases
-their data folders. Data is not deleted, and a folder that another enabled service uses stays bound.
-
-tavoctl service disable telnet)",
-                ServiceDisable);
-    service.Add("start", changes, Answer::Change(), R"(Starts services; whether they are enabled stays as it is.
-
-tavoctl service start --wait 10 crond)",
-                ServiceStart);
-    service.Add("stop", changes, Answer::Change(), R"(Stops services until they are started again; whether they are
-enabled stays as it is.
-
-tavoctl service stop media itunes)",
-                ServiceStop);
-    service.Add("restart", changes, Answer::Change(), R"(Restarts services.
-
-tavoctl service restart DB
-tavoctl service restart --wait 10 web)",
-                ServiceRestart);
-    service.Add("reload", changes, Answer::Change(),
-                R"(Sends running services a hang-up signal, on which they read their
-settings again.
-
-tavoctl service reload samba)",
-                ServiceReload);
-    service.Add("volume", changes, Answer::Change(), R"(Binds the data folders of a service to another volume and
-restarts the enabled services that use them. The data itself is not moved.
-
-tavoctl service volume web /volume2
-tavoctl service volume --force web /volume3
-tavoctl service volume --dry-run media 2)",
-                ServiceVolume);
-    service.Add("restore", changes, Answer::Change(),
-                R"(Brings services back after their volume has come back. Binds the
-data folders that are on it again and starts the enabled services that use them. Without VOLUME: enables the services
-again that have lost theirs, on the volumes that there are.
-
-tavoctl service restore /volume1
-tavoctl service restore)",
-                ServiceRestore);
+tavoctl service status --json ftp)");
+    AddServiceChanges(service);
 }
 
 }  // namespace tavoctl

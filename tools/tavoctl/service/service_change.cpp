@@ -1,9 +1,8 @@
 // tavoctl service: switching services, and where they keep their data.
 #include "tavo_service.h"
 
-#include "frame/failure.h"
-#include "frame/progress.h"
-#include "service/service.h"
+#include "frame/program.h"
+#include "frame/terminal.h"
 #include "service/service_state.h"
 
 #include <algorithm>
@@ -51,12 +50,9 @@ void RequireVolumes(int id)
         TAVOServiceSettingGet(folder, &share);
         const std::string target = share.szVolume;
         const std::string volume = target.substr(0, target.find('/', 1));
-        if (volume.starts_with("/volume") && !IsMounted(volume))
-            throw Failure{.attempted = std::string("enable ") + TAVOServiceNameGet(id),
-                          .reason = std::string("the data of ") + share.szShare + " is on " + volume +
-                                    ", which is not mounted",
-                          .hint = "--force uses an empty folder on another volume",
-                          .status = exit_not_found};
+        FailIf(volume.starts_with("/volume") && !IsMounted(volume), std::string("enable ") + TAVOServiceNameGet(id),
+               std::string("the data of ") + share.szShare + " is on " + volume + ", which is not mounted",
+               "--force uses an empty folder on another volume", exit_not_found);
     }
 }
 
@@ -106,7 +102,8 @@ void CompareService(Call &call, const ServiceAction &action, int id)
     }
 }
 
-Action SwitchServices(Arguments &in, const ServiceAction &action)
+template <const ServiceAction &action>
+Action SwitchServices(Arguments &in)
 {
     const auto names = in.Texts("SERVICE", service_kind, service_help);
     Given<std::optional<int64_t>> wait;
@@ -115,7 +112,7 @@ Action SwitchServices(Arguments &in, const ServiceAction &action)
         wait = in.Number("--wait", "SECONDS", "until it runs, at most that long; else it is a failure", 1);
     if (action.binds)
         force = in.Flag("--force", "also when the volume of its data is not mounted");
-    return [=, &action](Call &call) {
+    return [=](Call &call) {
         const std::vector<int> ids = FindServices(*names);
         if (action.binds && !*force)
             std::for_each(ids.begin(), ids.end(), RequireVolumes);
@@ -149,33 +146,6 @@ uint32_t ReloadMask(int id)
     return static_cast<uint32_t>(TAVOServiceDaemonIDGet(id));
 }
 
-}  // namespace
-
-Action ServiceEnable(Arguments &in)
-{
-    return SwitchServices(in, enable_action);
-}
-
-Action ServiceDisable(Arguments &in)
-{
-    return SwitchServices(in, disable_action);
-}
-
-Action ServiceStart(Arguments &in)
-{
-    return SwitchServices(in, start_action);
-}
-
-Action ServiceStop(Arguments &in)
-{
-    return SwitchServices(in, stop_action);
-}
-
-Action ServiceRestart(Arguments &in)
-{
-    return SwitchServices(in, restart_action);
-}
-
 Action ServiceReload(Arguments &in)
 {
     const auto names = in.Texts("SERVICE", service_kind, service_help);
@@ -188,11 +158,7 @@ Action ServiceReload(Arguments &in)
         for (const int id : ids) {
             const std::string what = std::string("reload ") + TAVOServiceNameGet(id);
             const uint32_t mask = ReloadMask(id);
-            if (!mask)
-                throw Failure{.attempted = what,
-                              .reason = "it has no daemon that could reload",
-                              .hint = "restart it instead",
-                              .status = exit_failed};
+            FailIf(!mask, what, "it has no daemon that could reload", "restart it instead");
             const int done = TAVONetService(mask, TAVO_DAEMON_RELOAD);
             Must(done >= 0, what);
             if (!done)
@@ -217,8 +183,7 @@ Action ServiceVolume(Arguments &in)
         if (!*force)
             RequireMounted(volume);
         const std::vector<int32_t> folders = FoldersOf(id);
-        if (folders.empty())
-            throw UsageFailure(attempted, "it keeps no data on a volume");
+        RefuseIf(folders.empty(), attempted, "it keeps no data on a volume");
         for (const int32_t folder : folders) {
             TAVOSERVICESHARE share = {};
             char path[PATH_MAX];
@@ -248,6 +213,54 @@ Action ServiceRestore(Arguments &in)
         else
             Must(TAVOServiceRestartfromVolumeNone() >= 0, "restore the services");
     };
+}
+
+}  // namespace
+
+void AddServiceChanges(Family &service)
+{
+    service.Add("enable", changes, SwitchServices<enable_action>,
+                R"(Enables services. Binds their data folders, on the volume where
+they are or else on the one with the most free space, sets their keys and starts them. Refuses a service whose data is
+on a volume that is not mounted.
+
+tavoctl service enable samba
+tavoctl service enable --wait 10 ftp ssh
+tavoctl service enable --dry-run media)");
+    service.Add("disable", changes, SwitchServices<disable_action>,
+                R"(Disables services. Sets their keys, stops them and releases
+their data folders. Data is not deleted, and a folder that another enabled service uses stays bound.
+
+tavoctl service disable telnet)");
+    service.Add("start", changes, SwitchServices<start_action>,
+                R"(Starts services; whether they are enabled stays as it is.
+
+tavoctl service start --wait 10 crond)");
+    service.Add("stop", changes, SwitchServices<stop_action>,
+                R"(Stops services until they are started again; whether they are
+enabled stays as it is.
+
+tavoctl service stop media itunes)");
+    service.Add("restart", changes, SwitchServices<restart_action>, R"(Restarts services.
+
+tavoctl service restart DB
+tavoctl service restart --wait 10 web)");
+    service.Add("reload", changes, ServiceReload, R"(Sends running services a hang-up signal, on which they read their
+settings again.
+
+tavoctl service reload samba)");
+    service.Add("volume", changes, ServiceVolume, R"(Binds the data folders of a service to another volume and
+restarts the enabled services that use them. The data itself is not moved.
+
+tavoctl service volume web /volume2
+tavoctl service volume --force web /volume3
+tavoctl service volume --dry-run media 2)");
+    service.Add("restore", changes, ServiceRestore, R"(Brings services back after their volume has come back. Binds the
+data folders that are on it again and starts the enabled services that use them. Without VOLUME: enables the services
+again that have lost theirs, on the volumes that there are.
+
+tavoctl service restore /volume1
+tavoctl service restore)");
 }
 
 }  // namespace tavoctl

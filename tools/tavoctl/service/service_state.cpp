@@ -3,13 +3,12 @@
 
 #include "tavo_file.h"
 #include "tavo_proc.h"
-#include "tavo_service.h"
 
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/host.h"
 #include "frame/processes.h"
-#include "frame/suggestion.h"
+#include "frame/text.h"
 #include "storage/mounted_volumes.h"
 
 #include <algorithm>
@@ -124,11 +123,8 @@ std::string VolumePath(const std::string &word)
 
 void RequireMounted(const std::string &volume)
 {
-    if (!IsMounted(volume))
-        throw Failure{.attempted = "use the volume " + volume,
-                      .reason = "it is not mounted",
-                      .hint = "volumes are /volume1, /volume2, ... in /proc/mounts",
-                      .status = exit_not_found};
+    FailIf(!IsMounted(volume), "use the volume " + volume, "it is not mounted",
+           "volumes are /volume1, /volume2, ... in /proc/mounts", exit_not_found);
 }
 
 }  // namespace tavoctl

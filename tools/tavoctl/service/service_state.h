@@ -4,7 +4,7 @@
 
 #include "tavo_service.h"
 
-#include "frame/argument_kind.h"
+#include "frame/arguments.h"
 #include "frame/column.h"
 
 #include <cstdint>
@@ -15,6 +15,8 @@
 #include <sys/types.h>
 
 namespace tavoctl {
+
+class Family;
 
 struct ServiceState {
     int id = 0;
@@ -33,10 +35,7 @@ inline constexpr Column<ServiceState> service_columns[] = {
     {"on", [](const ServiceState &s) { return TAVOServiceStatusGet(s.id) == 1; }, "enabled, bound and running", in_one},
     {"enabled", field<&ServiceState::enabled>, "null: it has no key, or its key says neither yes nor no"},
     {"running", field<&ServiceState::running>, "null: nothing of its own runs"},
-    {"pid",
-     [](const ServiceState &s) {
-         return s.pid > 0 ? std::optional(s.pid) : std::nullopt;
-     }},
+    {"pid", [](const ServiceState &s) { return s.pid > 0 ? std::optional(s.pid) : std::nullopt; }},
     {"since", [](const ServiceState &s) { return Maybe(s.since); }, "when its process was started"},
     {"shares", field<&ServiceState::shares>, "its data folders"},
     {"volumes", field<&ServiceState::volumes>, "where they are"},
@@ -65,6 +64,9 @@ std::vector<int32_t> FoldersOf(int id);
 
 // Returns whether a file system is mounted at `volume`, "/volume2".
 bool IsMounted(const std::string &volume);
+
+// The verbs that change something.
+void AddServiceChanges(Family &service);
 
 // For completion.
 std::vector<std::string> ServiceNames();

@@ -1,8 +1,7 @@
 // The files of users and groups as they were.
 #include "state/account_files.h"
 
-#include "frame/failure.h"
-#include "frame/input_file.h"
+#include "frame/files.h"
 
 #include <unistd.h>
 

@@ -5,9 +5,6 @@
 #include "account/account_plans.h"
 
 #include <csignal>
-#include <optional>
-#include <string>
-#include <vector>
 
 namespace tavoctl {
 

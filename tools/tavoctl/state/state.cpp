@@ -1,9 +1,7 @@
 // tavoctl state: settings, accounts, network and services as one document.
 #include "families.h"
-#include "frame/failure.h"
-#include "frame/input_file.h"
-#include "frame/program.h"
-#include "frame/suggestion.h"
+#include "frame/files.h"
+#include "frame/text.h"
 #include "state/state_document.h"
 #include "state/state_plan.h"
 
@@ -87,9 +85,7 @@ Action StateApply(Arguments &in)
     const auto only = Only(in);
     const auto no_probe = in.Flag("--no-probe", "do not ask by ARP first whether another host uses a new address");
     const auto path = in.Text("FILE", file_path, document_help);
-    return [=](Call &call) {
-        StatePlan(call, Document(*path, *only)).CarryOut(call, !*no_probe);
-    };
+    return [=](Call &call) { StatePlan(call, Document(*path, *only)).CarryOut(call, !*no_probe); };
 }
 
 }  // namespace
@@ -97,28 +93,25 @@ Action StateApply(Arguments &in)
 void AddState(Program &program)
 {
     Family &state = program.Add("state", "The whole appliance as one document");
-    state.Add("show", reads, Answer::Own(StateSchema, "#the-state-as-a-document"),
+    state.Add("show", reads, Answer::Own(StateSchema, "#the-state-as-a-document"), StateShow,
               R"(Writes settings, users, groups, network, quotas, services and storage as
 JSON, in the form that apply reads. Password hashes only when asked for: who has them can log in to Samba.
 
 tavoctl state show > box.json
 tavoctl state show --secrets --output /root/box.json
-tavoctl state show --only users,groups)",
-              StateShow);
-    state.Add("diff", reads, Answer::List(change_columns), R"(Lists what differs from a document, storage too; exit
+tavoctl state show --only users,groups)");
+    state.Add("diff", reads, Answer::List(change_columns), StateDiff,
+              R"(Lists what differs from a document, storage too; exit
 status 1 when something does. What the document does not speak of is not compared.
 
 tavoctl state diff box.json
-tavoctl state diff --only network --json box.json)",
-              StateDiff);
-    state.Add("apply", changes, Answer::Change(),
-              R"(Brings the appliance to what a document says; what it does not speak
+tavoctl state diff --only network --json box.json)");
+    state.Add("apply", changes, StateApply, R"(Brings the appliance to what a document says; what it does not speak
 of stays, and so does storage. Everything is looked at before anything is changed. Settings, accounts and network are
 each all or nothing; quotas and services go one by one, and those that fail are named.
 
 tavoctl state apply --dry-run box.json
-tavoctl state apply --only users,groups box.json)",
-              StateApply);
+tavoctl state apply --only users,groups box.json)");
 }
 
 }  // namespace tavoctl

@@ -7,7 +7,6 @@
 #include "account/quota.h"
 #include "account/user_verbs.h"
 #include "frame/containers.h"
-#include "frame/failure.h"
 #include "frame/host.h"
 #include "frame/json_document.h"
 #include "frame/program.h"
@@ -18,8 +17,6 @@
 #include "storage/storage_tree.h"
 
 #include <algorithm>
-
-#include <strings.h>
 
 namespace tavoctl {
 namespace {
@@ -56,16 +53,6 @@ StateJson SettingsJson()
         }
     }
     return settings;
-}
-
-std::vector<UserQuota> AllQuotas()
-{
-    std::vector<UserQuota> quotas;
-    for (const MountedVolume &volume : MountedVolumes())
-        if (HasQuotas(volume))
-            for (const UserQuota &quota : QuotasOn(volume))
-                quotas.push_back(quota);
-    return quotas;
 }
 
 // Those that are switched on and off. A service that is off keeps no folders.
@@ -173,8 +160,7 @@ StateJson ReadState(const Call &call, const Sections &sections, bool secrets)
 StateJson ParseState(const std::string &text, const Sections &sections)
 {
     StateJson document = ParseJsonDocument(text);
-    if (!document.is_object())
-        throw UsageFailure("take the document", "not an object");
+    RefuseIf(!document.is_object(), "take the document", "not an object");
     if (!document.contains("format_version") || document["format_version"] != format_version)
         RefuseState("format_version", "not " + std::to_string(format_version));
     StateJson wanted = StateJson::object();

@@ -7,10 +7,7 @@
 #include <nlohmann/json.hpp>
 
 #include <map>
-#include <optional>
 #include <set>
-#include <string>
-#include <vector>
 
 namespace tavoctl {
 

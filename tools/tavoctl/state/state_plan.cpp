@@ -5,11 +5,11 @@
 #include "tavo_lock.h"
 #include "tavo_service.h"
 
-#include "account/account_key.h"
+#include "account/account_rules.h"
 #include "account/user_verbs.h"
+#include "frame/files.h"
 #include "frame/held_locks.h"
 #include "frame/host.h"
-#include "frame/input_file.h"
 #include "frame/private_copy.h"
 #include "frame/settings_file.h"
 #include "service/service_state.h"
@@ -19,7 +19,6 @@
 #include <algorithm>
 #include <climits>
 #include <cmath>
-#include <cstdio>
 #include <iostream>
 
 namespace tavoctl {
@@ -249,7 +248,7 @@ void StatePlan::SetAccounts() const
             ThrowFirst(tavoctl::CarryOut(groups_));
     } catch (Failure &failure) {
         files.PutBack();
-        failure.hint += std::string(failure.hint.empty() ? "" : "; ") + "the accounts are as they were";
+        failure.AddHint("the accounts are as they were");
         throw;
     }
 }
@@ -264,7 +263,7 @@ void StatePlan::CarryOut(Call &call, bool probe)
             carry_out();
         } catch (Failure &failure) {
             if (!done.empty())
-                failure.hint += (failure.hint.empty() ? "" : "; ") + ("done before: " + done);
+                failure.AddHint("done before: " + done);
             throw;
         }
         done += (done.empty() ? "" : ", ") + std::string(name);
@@ -292,9 +291,7 @@ void StatePlan::CarryOutItems(Call &call)
     auto &changes = call.report.changes;
     for (auto item = items_.rbegin(); item != items_.rend(); ++item)
         if (item->refused) {
-            const auto at = [&](std::size_t index) {
-                return changes.begin() + static_cast<std::ptrdiff_t>(index);
-            };
+            const auto at = [&](std::size_t index) { return changes.begin() + static_cast<std::ptrdiff_t>(index); };
             changes.erase(at(item->first), at(item->last));
             failed.insert(failed.begin(), item->name);
         }

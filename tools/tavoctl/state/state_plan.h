@@ -4,16 +4,11 @@
 
 #include "account/account_plans.h"
 #include "account/quota.h"
-#include "frame/failure.h"
 #include "network/net_apply.h"
 #include "state/state_document.h"
 
-#include <functional>
 #include <map>
-#include <optional>
 #include <set>
-#include <string>
-#include <vector>
 
 namespace tavoctl {
 

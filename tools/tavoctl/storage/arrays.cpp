@@ -3,6 +3,7 @@
 
 #include "frame/containers.h"
 #include "frame/failure.h"
+#include "frame/files.h"
 #include "storage/device.h"
 
 #include <algorithm>
@@ -23,10 +24,6 @@ struct Level {
 constexpr Level levels[] = {
     {RAID_LEVEL_0, "raid0"}, {RAID_LEVEL_1, "raid1"},   {RAID_LEVEL_5, "raid5"},
     {RAID_LEVEL_6, "raid6"}, {RAID_LEVEL_10, "raid10"}, {RAID_LEVEL_LINEAR, "linear"},
-};
-
-struct FreeList {
-    void operator()(RAIDLIST *list) const { RAIDListFree(list); }
 };
 
 std::optional<std::string> Attribute(const RAIDINFO &info, const std::string &name)
@@ -63,6 +60,12 @@ std::string_view ArrayNumber(std::string_view word)
     return word;
 }
 
+// Returns whether it is the disk or a partition of it.
+bool IsOn(const std::string &path, const std::string &disk)
+{
+    return path.starts_with(disk) && path.find_first_not_of("0123456789", disk.size()) == path.npos;
+}
+
 bool IsArrayName(const std::string &word)
 {
     const std::string_view number = ArrayNumber(word);
@@ -90,19 +93,25 @@ Array ReadArray(const std::string &path)
 {
     RAIDINFO *info = nullptr;
     const int found = RAIDInfoGet(path.c_str(), &info);
-    if (found < 0)
-        throw LibraryFailure("read the array " + path);
+    Must(found >= 0, "read the array " + path);
     if (found == 0)
         throw NotFound("read the array " + path, ERR_PATH_NOT_FOUND, "tavoctl raid list shows the arrays that run");
     return Array(info);
 }
 
+bool Runs(const std::string &path)
+{
+    RAIDINFO *info = nullptr;
+    const bool runs = RAIDInfoGet(path.c_str(), &info) == 1;
+    RAIDInfoFree(info);
+    return runs;
+}
+
 std::vector<Array> ReadArrays()
 {
     RAIDLIST *list = nullptr;
-    if (RAIDInfoEnum(&list) < 0)
-        throw LibraryFailure("list the arrays");
-    const std::unique_ptr<RAIDLIST, FreeList> owner(list);
+    Must(RAIDInfoEnum(&list) >= 0, "list the arrays");
+    const std::unique_ptr<RAIDLIST, By<RAIDListFree>> owner(list);
     std::vector<Array> arrays;
     for (RAIDLIST *node = list; node; node = node->pNext)
         arrays.emplace_back(std::exchange(node->pInfo, nullptr));
@@ -113,25 +122,18 @@ std::vector<std::string> ArrayNames()
 {
     StringList paths;
     std::vector<std::string> names;
-    if (RAIDPathEnum(paths.Address()) > 0) {
+    if (RAIDPathEnum(paths.Address()) > 0)
         for (const std::string &path : paths.Items())
             names.push_back(DeviceName(path));
-    }
     return names;
 }
 
 const char *StatusText(int status)
 {
-    switch (status) {
-    case 0:
-        return "stopped";
-    case RAID_STATUS_NORMAL:
-        return "normal";
-    case RAID_STATUS_DEGRADED:
-        return "degraded";
-    default:
-        return "crashed";
-    }
+    return status == 0                      ? "stopped"
+           : status == RAID_STATUS_NORMAL   ? "normal"
+           : status == RAID_STATUS_DEGRADED ? "degraded"
+                                            : "crashed";
 }
 
 std::string LevelText(int level)
@@ -143,20 +145,18 @@ std::string LevelText(int level)
 
 std::optional<int> LevelOf(const std::string &word)
 {
-    for (const Level &known : levels) {
+    for (const Level &known : levels)
         if (word == known.name || "raid" + word == known.name)
             return known.level;
-    }
     return std::nullopt;
 }
 
 std::vector<std::string> Members(const RAIDINFO &info, int states)
 {
     std::vector<std::string> paths;
-    for (const RAIDMEMBER *member = info.pMembers; member; member = member->pNext) {
+    for (const RAIDMEMBER *member = info.pMembers; member; member = member->pNext)
         if (member->nState & states)
             paths.emplace_back(member->szPath);
-    }
     return paths;
 }
 
@@ -168,9 +168,8 @@ std::string MemberOf(const RAIDINFO &info, const std::string &word)
         return path;
     if (std::isdigit(static_cast<unsigned char>(path.back())))
         return "";
-    const auto part = std::find_if(members.begin(), members.end(), [&](const std::string &member) {
-        return member.starts_with(path) && member.find_first_not_of("0123456789", path.size()) == member.npos;
-    });
+    const auto part =
+        std::find_if(members.begin(), members.end(), [&](const std::string &member) { return IsOn(member, path); });
     return part == members.end() ? "" : *part;
 }
 
@@ -214,15 +213,9 @@ std::vector<std::string> ArraysOf(const std::vector<Array> &arrays, const std::s
 {
     std::vector<std::string> names;
     for (const Array &array : arrays) {
-        for (const RAIDMEMBER *member = array->pMembers; member; member = member->pNext) {
-            const std::string_view path = member->szPath;
-            const bool belongs =
-                path.starts_with(disk) && path.find_first_not_of("0123456789", disk.size()) == path.npos;
-            if (belongs) {
-                names.push_back(DeviceName(array->szPath));
-                break;
-            }
-        }
+        const std::vector<std::string> members = Members(*array, ~0);
+        if (std::any_of(members.begin(), members.end(), [&](const std::string &path) { return IsOn(path, disk); }))
+            names.push_back(DeviceName(array->szPath));
     }
     return names;
 }

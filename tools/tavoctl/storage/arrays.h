@@ -4,7 +4,8 @@
 
 #include "tavo_raid.h"
 
-#include "frame/argument_kind.h"
+#include "frame/arguments.h"
+#include "frame/containers.h"
 
 #include <memory>
 #include <optional>
@@ -13,10 +14,7 @@
 
 namespace tavoctl {
 
-struct FreeArray {
-    void operator()(RAIDINFO *info) const { RAIDInfoFree(info); }
-};
-using Array = std::unique_ptr<RAIDINFO, FreeArray>;
+using Array = std::unique_ptr<RAIDINFO, By<RAIDInfoFree>>;
 
 extern const ArgumentKind array_kind;
 inline constexpr char array_help[] = "its name, md2 or /dev/md2";
@@ -27,6 +25,7 @@ std::string ArrayPath(const std::string &word);
 // Throws a Failure when there is no such array.
 Array ReadArray(const std::string &path);
 std::vector<Array> ReadArrays();
+bool Runs(const std::string &path);
 std::vector<std::string> ArrayNames();  // for completion
 
 const char *StatusText(int status);  // "degraded"; 0: "stopped"

@@ -6,31 +6,23 @@
 
 #include "frame/containers.h"
 #include "frame/failure.h"
-#include "frame/suggestion.h"
+#include "frame/files.h"
+#include "frame/text.h"
 
 #include <algorithm>
 #include <cctype>
-#include <cerrno>
 #include <cstdio>
 #include <cstdlib>
-#include <cstring>
 #include <filesystem>
-#include <fstream>
 #include <memory>
 
-#include <fcntl.h>
 #include <sys/stat.h>
 #include <sys/utsname.h>
-#include <unistd.h>
 
 namespace tavoctl {
 namespace {
 
 constexpr std::string_view dev = "/dev/";
-
-struct FreeBlock {
-    void operator()(void *block) const { std::free(block); }
-};
 
 // Bays come before units and ports; sdb before sdaa.
 bool IsBefore(const std::string &left, const std::string &right)
@@ -81,9 +73,7 @@ std::optional<int> PortOf(const std::string &name)
 std::string BayOfPort(const std::string &disk)
 {
     const auto port = PortOf(DeviceName(disk));
-    const auto name = [](int bay) {
-        return std::string("sd") + static_cast<char>('a' + bay - 1);
-    };
+    const auto name = [](int bay) { return std::string("sd") + static_cast<char>('a' + bay - 1); };
     const int bays = TAVOMaxDiskGet();
     for (int bay = 1; port && bay <= bays; ++bay) {
         const auto other = PortOf(name(bay));
@@ -124,19 +114,26 @@ std::string DiskPath(const std::string &word)
     return path;
 }
 
+std::vector<std::string> DiskPaths(const std::vector<std::string> &words)
+{
+    std::vector<std::string> paths;
+    for (const std::string &word : words)
+        paths.push_back(DiskPath(word));
+    return paths;
+}
+
 std::vector<std::string> DiskPaths()
 {
     int32_t *numbers = nullptr;
     const int count = TAVODiskEnum(1, &numbers);
-    if (count < 0)
-        throw LibraryFailure("list the disks");
-    const std::unique_ptr<int32_t, FreeBlock> owner(numbers);
+    Must(count >= 0, "list the disks");
+    const std::unique_ptr<int32_t, By<std::free>> owner(numbers);
     std::vector<std::string> paths;
     for (int i = 0; i < count; ++i) {
         TAVODISKINFO *info = nullptr;
         if (TAVODiskGetInfo(1, numbers[i], &info) != 0)
             continue;  // gone since
-        const std::unique_ptr<TAVODISKINFO, FreeBlock> summary(info);
+        const std::unique_ptr<TAVODISKINFO, By<std::free>> summary(info);
         if (std::string_view(info->szName).starts_with("sd"))
             paths.push_back(std::string(dev) + info->szName);
     }
@@ -208,10 +205,9 @@ void RefuseToWakeAny(bool wake, const std::string &attempted)
 {
     if (wake)
         return;
-    for (const std::string &disk : DiskPaths()) {
+    for (const std::string &disk : DiskPaths())
         if (PowerOf(disk) == Power::standby)
             RefuseToWake(disk, false, attempted);
-    }
 }
 
 void RefuseTooLarge(uint64_t size, const std::string &attempted)
@@ -220,36 +216,22 @@ void RefuseTooLarge(uint64_t size, const std::string &attempted)
     struct utsname system;
     const std::string machine = ::uname(&system) == 0 ? system.machine : "";
     const bool narrow = sizeof(void *) == 4 && !machine.ends_with("64");
-    if (narrow && size > most)
-        throw Failure{.attempted = attempted,
-                      .reason = "larger than the 16 TiB of one device that this system can reach",
-                      .hint = "use several smaller ones"};
+    FailIf(narrow && size > most, attempted, "larger than the 16 TiB of one device that this system can reach",
+           "use several smaller ones");
 }
 
-uint64_t SizeOfDevice(const std::string &path)
+std::optional<Bytes> SizeOf(const std::string &device)
 {
     uint64_t sectors = 0;
-    return DiskSizeGet(path.c_str(), &sectors) == 1 ? sectors * 512 : 0;
+    return DiskSizeGet(device.c_str(), &sectors) == 1 ? std::optional(Bytes{sectors * 512}) : std::nullopt;
 }
 
-std::optional<std::string> KernelText(const std::string &path)
+uint64_t SizeOfAll(const std::vector<std::string> &devices)
 {
-    std::ifstream file(path);
-    std::string line;
-    if (!std::getline(file, line))
-        return std::nullopt;
-    return line;
-}
-
-void SetKernelText(const std::string &path, const std::string &text, const std::string &attempted)
-{
-    const int fd = ::open(path.c_str(), O_WRONLY | O_CLOEXEC);
-    const bool written = fd >= 0 && ::write(fd, text.data(), text.size()) == static_cast<ssize_t>(text.size());
-    const int error = errno;
-    if (fd >= 0)
-        ::close(fd);
-    if (!written)
-        throw SystemFailure(attempted, error);
+    uint64_t size = 0;
+    for (const std::string &device : devices)
+        size += SizeOf(device).value_or(Bytes{0}).count;
+    return size;
 }
 
 const ArgumentKind disk_kind = {

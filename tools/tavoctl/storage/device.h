@@ -4,9 +4,9 @@
 
 #include "tavo_disk.h"
 
-#include "frame/argument_kind.h"
+#include "frame/arguments.h"
 #include "frame/column.h"
-#include "frame/terminal_text.h"
+#include "frame/text.h"
 
 #include <cstdint>
 #include <optional>
@@ -23,6 +23,8 @@ std::string DeviceName(const std::string &path);  // "sda3"
 
 // The path of a whole disk; throws a Failure when it is not there.
 std::string DiskPath(const std::string &word);
+
+std::vector<std::string> DiskPaths(const std::vector<std::string> &words);
 
 // All disks: the internal bays in their order, then the others by name.
 std::vector<std::string> DiskPaths();
@@ -67,13 +69,8 @@ void RefuseUsed(const std::vector<std::string> &devices, const std::string &atte
 
 // A 32-bit kernel reaches 16 TiB of one device: throws a Failure when a device of so many bytes is larger.
 void RefuseTooLarge(uint64_t size, const std::string &attempted);
-uint64_t SizeOfDevice(const std::string &path);  // bytes; 0 when it cannot be read
-
-// The first line of a file of the kernel's.
-std::optional<std::string> KernelText(const std::string &path);
-
-// Writes a setting of the kernel's; throws a Failure when it does not take it.
-void SetKernelText(const std::string &path, const std::string &text, const std::string &attempted);
+std::optional<Bytes> SizeOf(const std::string &device);       // nothing when it cannot be read
+uint64_t SizeOfAll(const std::vector<std::string> &devices);  // bytes
 
 inline constexpr char disk_help[] = "its name, sda or /dev/sda";
 inline constexpr char member_help[] = "a partition or disk, sda3 or /dev/sda3";

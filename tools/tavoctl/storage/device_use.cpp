@@ -2,7 +2,7 @@
 #include "tavo_error.h"
 
 #include "frame/failure.h"
-#include "frame/folder_names.h"
+#include "frame/files.h"
 #include "storage/device.h"
 
 #include <cerrno>
@@ -13,7 +13,6 @@
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <sys/sysmacros.h>
-#include <unistd.h>
 
 namespace tavoctl {
 namespace {
@@ -31,17 +30,15 @@ std::optional<dev_t> DeviceNumber(const std::string &path)
 // Two names may mean one device: /dev/vg1/lv and /dev/mapper/vg1-lv.
 std::string MountOf(dev_t number)
 {
-    for (const Mount &mount : Mounts()) {
+    for (const Mount &mount : Mounts())
         if (DeviceNumber(mount.source) == number)
             return " is mounted on " + mount.place;
-    }
     std::ifstream swaps("/proc/swaps");
     std::string line;
     std::getline(swaps, line);  // the heading
-    while (std::getline(swaps, line)) {
+    while (std::getline(swaps, line))
         if (DeviceNumber(line.substr(0, line.find_first_of(" \t"))) == number)
             return " is swap space";
-    }
     return "";
 }
 
@@ -57,10 +54,8 @@ std::string HolderOf(const fs::path &device)
 
 bool IsClaimed(const std::string &path)
 {
-    const int fd = ::open(path.c_str(), O_RDONLY | O_EXCL | O_NONBLOCK | O_CLOEXEC);
-    if (fd >= 0)
-        ::close(fd);
-    return fd < 0 && errno == EBUSY;
+    const Descriptor device(::open(path.c_str(), O_RDONLY | O_EXCL | O_NONBLOCK | O_CLOEXEC));
+    return !device.IsOpen() && errno == EBUSY;
 }
 
 }  // namespace
@@ -84,10 +79,9 @@ std::string UseOf(const std::string &device)
     if (!number)
         return "";
     const fs::path place = "/sys/dev/block/" + std::to_string(major(*number)) + ":" + std::to_string(minor(*number));
-    for (const std::string &use : {MountOf(*number), HolderOf(place)}) {
+    for (const std::string &use : {MountOf(*number), HolderOf(place)})
         if (!use.empty())
             return device + use;
-    }
     std::error_code none;
     for (const std::string &name : FolderNames(place)) {
         if (!fs::exists(place / name / "partition", none))

@@ -1,7 +1,5 @@
 // tavoctl disk: the disks, their health and their power.
 #include "families.h"
-#include "frame/failure.h"
-#include "frame/program.h"
 #include "storage/arrays.h"
 #include "storage/device.h"
 #include "storage/disk_facts.h"
@@ -13,10 +11,7 @@ namespace {
 
 constexpr Column<DiskFacts> disk_columns[] = {
     {"bay", field<&DiskFacts::bay>, "1 for an internal bay, 1-2 in a unit, usb, esata, nvme"},
-    {"disk",
-     [](const DiskFacts &d) {
-         return DeviceName(d.path);
-     }},
+    {"disk", [](const DiskFacts &d) { return DeviceName(d.path); }},
     {"path", field<&DiskFacts::path>, "", in_details},
     {"model", field<&DiskFacts::model>},
     {"serial", field<&DiskFacts::serial>, "as on the label of the disk"},
@@ -53,16 +48,10 @@ constexpr Column<DiskTemperature> temperature_columns[] = {
 
 constexpr Column<SmartAttribute> smart_columns[] = {
     {"id", field<&SmartAttribute::id>},
-    {"name",
-     [](const SmartAttribute &a) {
-         return std::string(SmartName(a.id));
-     }},
+    {"name", [](const SmartAttribute &a) { return std::string(SmartName(a.id)); }},
     {"value", field<&SmartAttribute::value>},
     {"worst", field<&SmartAttribute::worst>},
-    {"threshold",
-     [](const SmartAttribute &a) {
-         return a.threshold < 0 ? std::nullopt : std::optional(a.threshold);
-     }},
+    {"threshold", [](const SmartAttribute &a) { return a.threshold < 0 ? std::nullopt : std::optional(a.threshold); }},
     {"state", [](const SmartAttribute &a) -> std::string { return a.Fails() ? "failing" : "good"; }, "failing or good"},
     {"raw", field<&SmartAttribute::raw>},
 };
@@ -76,35 +65,23 @@ constexpr uint64_t mib = 1 << 20;
 
 constexpr Column<WipingJob> wiping_columns[] = {
     {"disk", field<&WipingJob::disk>},
-    {"done",
-     [](const WipingJob &job) {
-         return Bytes{job.done * mib};
-     }},
-    {"total",
-     [](const WipingJob &job) {
-         return Bytes{job.total * mib};
-     }},
+    {"done", [](const WipingJob &job) { return Bytes{job.done * mib}; }},
+    {"total", [](const WipingJob &job) { return Bytes{job.total * mib}; }},
     {"percent",
-     [](const WipingJob &job) {
-         return job.total ? std::optional(job.done * 100 / job.total) : std::nullopt;
-     }},
+     [](const WipingJob &job) { return job.total ? std::optional(job.done * 100 / job.total) : std::nullopt; }},
 };
 
 Action DiskList(Arguments &in)
 {
     const auto wake = in.Flag("--wake", wake_help);
-    return [=](Call &call) {
-        call.List(disk_columns, AllDisks(*wake, ReadArrays()));
-    };
+    return [=](Call &call) { call.List(disk_columns, AllDisks(*wake, ReadArrays())); };
 }
 
 Action DiskInfo(Arguments &in)
 {
     const auto disk = in.Text("DISK", disk_kind, disk_help);
     const auto wake = in.Flag("--wake", wake_help);
-    return [=](Call &call) {
-        call.One(disk_columns, DescribeDisk(DiskPath(*disk), *wake, ReadArrays()));
-    };
+    return [=](Call &call) { call.One(disk_columns, DescribeDisk(DiskPath(*disk), *wake, ReadArrays())); };
 }
 
 Action DiskSmart(Arguments &in)
@@ -128,8 +105,7 @@ Action ShowTemperature(Arguments &in)
         const std::string attempted = "read the temperature of " + path;
         RefuseToWake(path, *wake, attempted);
         const int degrees = TAVODiskTemperatureGet(path.c_str());
-        if (degrees == -1)
-            throw Failure{.attempted = attempted, .reason = "the disk does not tell it"};
+        FailIf(degrees == -1, attempted, "the disk does not tell it");
         call.Value(std::to_string(degrees), temperature_columns, DiskTemperature{path, degrees});
     };
 }
@@ -142,8 +118,7 @@ Action DiskWipeStatus(Arguments &in)
         const std::string attempted = "read how far the wiping of " + path + " has come";
         constexpr uint64_t untouched = ~uint64_t{0};
         WipingJob job = {path, untouched, untouched};
-        if (DiskDDStatusGet(path.c_str(), &job.done, &job.total) != 0)
-            throw Failure{.attempted = attempted, .reason = "the job's file is malformed"};
+        FailIf(DiskDDStatusGet(path.c_str(), &job.done, &job.total) != 0, attempted, "the job's file is malformed");
         if (job.done == untouched)
             throw NotFound(attempted, ERR_FILE_NOT_FOUND, "no such job runs");
         call.One(wiping_columns, job);
@@ -168,8 +143,7 @@ Action DiskStandby(Arguments &in)
     const auto all = in.Flag("--all", "all disks");
     const auto timer = in.Option("--timer", "MINUTES", minutes_kind, "set the spin-down timer of all disks instead");
     return [=](Call &call) {
-        if (!words->empty() + *all + timer->has_value() != 1)
-            throw UsageFailure("spin down", "name disks, or use --all, or --timer");
+        RefuseIf(!words->empty() + *all + timer->has_value() != 1, "spin down", "name disks, or use --all, or --timer");
         if (*timer) {
             call.Change("all disks", "spin-down timer", {}, **timer);
             if (call.Proceed("Set the spin-down timer of all disks?"))
@@ -181,11 +155,9 @@ Action DiskStandby(Arguments &in)
             if (call.Proceed("Spin down all disks, the system's own too?"))
                 Must(TAVODiskSetStandby() == 0, "spin down all disks");
         } else {
-            std::vector<std::string> paths;
-            for (const std::string &word : *words) {
-                paths.push_back(DiskPath(word));
-                call.Change(paths.back(), "state", {}, "standby");
-            }
+            const std::vector<std::string> paths = DiskPaths(*words);
+            for (const std::string &path : paths)
+                call.Change(path, "state", {}, "standby");
             if (!call.Proceed("Spin down " + Joined(paths, ", ") + "?"))
                 return;
             // Flushing first: a later write would wake it again.
@@ -208,8 +180,7 @@ Action DiskCache(Arguments &in)
         if (!call.Proceed())
             return;
         Must(TAVODiskWriteCacheSet(path.c_str(), wanted) == 0, attempted);
-        if (TAVODiskWriteCacheGet(path.c_str()) != wanted)
-            throw Failure{.attempted = attempted, .reason = "the drive has not done it"};
+        FailIf(TAVODiskWriteCacheGet(path.c_str()) != wanted, attempted, "the drive has not done it");
     };
 }
 
@@ -218,51 +189,48 @@ Action DiskCache(Arguments &in)
 void AddDisk(Program &program)
 {
     Family &disk = program.Add("disk", "Disks: what they are, their health and their power");
-    disk.Add("list", reads, Answer::List(disk_columns), R"(Lists the bays with their disks, then other disks, and the
+    disk.Add("list", reads, Answer::List(disk_columns), DiskList,
+             R"(Lists the bays with their disks, then other disks, and the
 arrays that each serves. A disk in standby is not read, so its temperature and layout are not known.
 
 tavoctl disk list
-tavoctl disk list --wake --json)",
-             DiskList);
-    disk.Add("info", reads, Answer::One(disk_columns), R"(Shows what is known of a disk. One in standby is not read
+tavoctl disk list --wake --json)");
+    disk.Add("info", reads, Answer::One(disk_columns), DiskInfo,
+             R"(Shows what is known of a disk. One in standby is not read
 unless --wake is given.
 
 tavoctl disk info sda
-tavoctl disk info --wake --json /dev/sdb)",
-             DiskInfo);
-    disk.Add("smart", reads, Answer::List(smart_columns), R"(Lists the SMART attributes of a disk. The drive's own value
+tavoctl disk info --wake --json /dev/sdb)");
+    disk.Add("smart", reads, Answer::List(smart_columns), DiskSmart,
+             R"(Lists the SMART attributes of a disk. The drive's own value
 counts down from 100 or so, and at its threshold the drive expects to fail. A disk in standby is not read unless --wake
 is given.
 
 tavoctl disk smart sda
-tavoctl disk smart --wake --json sdb)",
-             DiskSmart);
-    disk.Add("health", reads, Answer::List(health_columns), R"(Reports one verdict on each disk, with its reason: good;
+tavoctl disk smart --wake --json sdb)");
+    disk.Add("health", reads, Answer::List(health_columns), DiskHealthList,
+             R"(Reports one verdict on each disk, with its reason: good;
 worn, which is to be replaced soon (sectors could not be read, or had to be replaced); failing (an attribute has reached
 its threshold, or a self-test failed), with exit status 1. A disk in standby is not read unless --wake is given.
 
 tavoctl disk health
-tavoctl disk health --json sda sdb)",
-             DiskHealthList);
-    disk.Add("test", changes, Answer::Change(),
-             R"(Starts the drive's own test, which goes on in the background while the
+tavoctl disk health --json sda sdb)");
+    disk.Add("test", changes, DiskTest, R"(Starts the drive's own test, which goes on in the background while the
 disk is used. `disk health` shows how far it is and what came of it.
 
 tavoctl disk test --short sda
 tavoctl disk test --long --wait sda
-tavoctl disk test --stop sda)",
-             DiskTest);
-    disk.Add("temperature", reads, Answer::One(temperature_columns), R"(Prints the temperature of a disk in degrees
+tavoctl disk test --stop sda)");
+    disk.Add("temperature", reads, Answer::One(temperature_columns), ShowTemperature,
+             R"(Prints the temperature of a disk in degrees
 Celsius. A disk in standby is not read unless --wake is given.
 
-tavoctl disk temperature sda)",
-             ShowTemperature);
-    disk.Add("wipe-status", reads, Answer::One(wiping_columns), R"(Shows how far the wiping job of a disk has come.
+tavoctl disk temperature sda)");
+    disk.Add("wipe-status", reads, Answer::One(wiping_columns), DiskWipeStatus,
+             R"(Shows how far the wiping job of a disk has come.
 
-tavoctl disk wipe-status sda)",
-             DiskWipeStatus);
-    disk.Add("standby", changes | destroys, Answer::Change(),
-             R"(Writes out what the system holds for a disk and spins it
+tavoctl disk wipe-status sda)");
+    disk.Add("standby", changes | destroys, DiskStandby, R"(Writes out what the system holds for a disk and spins it
 down. --all does it to every disk, which takes more than ten seconds, the system's own and USB disks included. --timer
 sets after how many idle minutes the drives spin down by themselves: 0 never, 1 to 21, multiples of 30 up to 330, or
 480. The minutes are saved; the drives' own timer is 5.5 hours for every choice but 0, since it only backs up the
@@ -270,13 +238,11 @@ system's.
 
 tavoctl disk standby sdb
 tavoctl disk standby --yes --all
-tavoctl disk standby --yes --timer 20)",
-             DiskStandby);
-    disk.Add("cache", changes, Answer::Change(), R"(Switches the write cache of a drive. With it a power failure loses
+tavoctl disk standby --yes --timer 20)");
+    disk.Add("cache", changes, DiskCache, R"(Switches the write cache of a drive. With it a power failure loses
 what the drive has not written yet; without it writing is slower. `disk info` shows its state.
 
-tavoctl disk cache sda off)",
-             DiskCache);
+tavoctl disk cache sda off)");
 }
 
 }  // namespace tavoctl

@@ -4,10 +4,7 @@
 #include "tavo_appliance.h"
 #include "tavo_partition.h"
 
-#include "storage/nvme.h"
-
 #include <algorithm>
-#include <fstream>
 #include <iterator>
 
 namespace tavoctl {
@@ -22,8 +19,7 @@ std::string Trimmed(std::string text)
 // The kernel keeps the page that the drive gave when it was found: a header of four bytes, and the number.
 std::optional<std::string> SerialOf(const std::string &disk)
 {
-    std::ifstream file("/sys/block/" + DeviceName(disk) + "/device/vpd_pg80", std::ios::binary);
-    const std::string page((std::istreambuf_iterator<char>(file)), {});
+    const std::string page = FileText("/sys/block/" + DeviceName(disk) + "/device/vpd_pg80");
     constexpr std::size_t header = 4;
     return Maybe(page.size() > header ? Trimmed(page.substr(header)) : "");
 }
@@ -38,18 +34,6 @@ std::optional<std::string> LayoutOf(const std::string &disk)
     if (PartitionTableTypeGet(disk.c_str(), &kind) != 0)
         return {};
     return kind == PARTITION_TABLE_NONE ? "blank" : "foreign";
-}
-
-DiskFacts DescribeNvme(const NvmeDisk &disk)
-{
-    DiskFacts facts = {.path = "/dev/" + disk.name, .bay = "nvme"};
-    facts.power = Power::spinning;
-    facts.model = Maybe(disk.model);
-    facts.serial = Maybe(disk.serial);
-    facts.size = Bytes{disk.size};
-    facts.temperature = disk.temperature;
-    facts.health = disk.health;
-    return facts;
 }
 
 }  // namespace
@@ -69,9 +53,7 @@ DiskFacts DescribeDisk(const std::string &path, bool wake, const std::vector<Arr
     if (TAVOLnxDiskGetModel(path.c_str(), text, sizeof text) == 0)
         disk.model = Trimmed(text);
     disk.serial = SerialOf(path);
-    uint64_t sectors = 0;
-    if (DiskSizeGet(path.c_str(), &sectors) == 1)
-        disk.size = Bytes{sectors * 512};
+    disk.size = SizeOf(path);
     if (!disk.asked)
         return disk;
     disk.layout = LayoutOf(path);
@@ -100,8 +82,8 @@ std::vector<DiskFacts> AllDisks(bool wake, const std::vector<Array> &arrays)
         sorted.push_back({.path = path, .bay = std::to_string(bay), .there = false, .role = ArraysOf(arrays, path)});
     }
     std::move(disks.begin(), disks.end(), std::back_inserter(sorted));
-    for (const NvmeDisk &disk : NvmeDisks())
-        sorted.push_back(DescribeNvme(disk));
+    for (DiskFacts &disk : NvmeDisks())
+        sorted.push_back(std::move(disk));
     return sorted;
 }
 

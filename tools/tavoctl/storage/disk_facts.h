@@ -28,6 +28,9 @@ struct DiskFacts {
 // With wake, the disk is read although it may sleep.
 DiskFacts DescribeDisk(const std::string &path, bool wake, const std::vector<Array> &arrays);
 
+// By name.
+std::vector<DiskFacts> NvmeDisks();
+
 // All bays in their order, empty ones included, then the other disks by name, then NVMe disks.
 std::vector<DiskFacts> AllDisks(bool wake, const std::vector<Array> &arrays);
 

@@ -1,6 +1,6 @@
 // tavoctl disk: the verdict on a drive, and its self-tests.
-#include "frame/failure.h"
-#include "frame/progress.h"
+#include "frame/files.h"
+#include "frame/terminal.h"
 #include "storage/device.h"
 #include "storage/disk_verbs.h"
 #include "storage/smart_pages.h"
@@ -12,7 +12,6 @@
 
 #include <linux/hdreg.h>
 #include <sys/ioctl.h>
-#include <unistd.h>
 
 namespace tavoctl {
 namespace {
@@ -23,8 +22,7 @@ constexpr unsigned char stop_test = 127;
 
 void ReadPage(const std::string &disk, unsigned char (&page)[512], const std::string &attempted)
 {
-    if (SmartDataRead(disk.c_str(), page, 0) != 0)
-        throw Failure{.attempted = attempted, .reason = "the drive does not give its SMART data"};
+    FailIf(SmartDataRead(disk.c_str(), page, 0) != 0, attempted, "the drive does not give its SMART data");
 }
 
 SelfTest ReadSelfTest(const std::string &disk, const std::string &attempted)
@@ -38,13 +36,10 @@ SelfTest ReadSelfTest(const std::string &disk, const std::string &attempted)
 void Command(const std::string &disk, unsigned char test, const std::string &attempted)
 {
     unsigned char words[4] = {0xB0, test, 0xD4, 0};
-    const int fd = TAVOIDiskRawOpen(disk.c_str());
-    Must(fd >= 0, attempted);
-    const int result = ::ioctl(fd, HDIO_DRIVE_CMD, words);
-    const int error = errno;
-    ::close(fd);
-    if (result != 0)
-        throw SystemFailure(attempted, error);
+    const Descriptor drive(TAVOIDiskRawOpen(disk.c_str()));
+    Must(drive.IsOpen(), attempted);
+    if (::ioctl(drive.Get(), HDIO_DRIVE_CMD, words) != 0)
+        throw SystemFailure(attempted, errno);
 }
 
 void WaitForTest(const std::string &disk, const std::string &attempted)
@@ -53,8 +48,7 @@ void WaitForTest(const std::string &disk, const std::string &attempted)
     for (;; std::this_thread::sleep_for(std::chrono::seconds(2))) {
         const SelfTest test = ReadSelfTest(disk, attempted);
         if (!test.running) {
-            if (test.result != "passed")
-                throw Failure{.attempted = attempted, .reason = "the test " + test.result};
+            FailIf(test.result != "passed", attempted, "the test " + test.result);
             return;
         }
         progress.Show("self-test " + std::to_string(test.percent) + " %");
@@ -95,9 +89,7 @@ Action DiskHealthList(Arguments &in)
     const auto words = in.Texts("DISK", disk_kind, disk_help, 0);
     const auto wake = in.Flag("--wake", wake_help);
     return [=](Call &call) {
-        std::vector<std::string> paths;
-        for (const std::string &word : *words)
-            paths.push_back(DiskPath(word));
+        const std::vector<std::string> paths = DiskPaths(*words);
         std::vector<DiskHealth> disks;
         for (const std::string &path : paths.empty() ? DiskPaths() : paths)
             disks.push_back(ReadHealth(path, *wake));
@@ -119,12 +111,12 @@ Action DiskTest(Arguments &in)
     return [=](Call &call) {
         const std::string disk = DiskPath(*word);
         const std::string attempted = "test " + disk;
-        if (*quick + *thorough + *stop != 1 || (*stop && *wait))
-            throw UsageFailure(attempted, "say one of --short, --long and --stop");
+        RefuseIf(*quick + *thorough + *stop != 1 || (*stop && *wait), attempted,
+                 "say one of --short, --long and --stop");
         const SelfTest before = ReadSelfTest(disk, attempted);
-        if (before.running && !*stop)
-            throw BusyFailure(attempted, "a test runs, " + std::to_string(before.percent) + " % of it are done",
-                              "tavoctl disk test --stop ends it");
+        BusyIf(before.running && !*stop, attempted,
+               "a test runs, " + std::to_string(before.percent) + " % of it are done",
+               "tavoctl disk test --stop ends it");
         if (before.running || !*stop)
             call.Change(disk, "self_test", before.result, *stop ? "stopped" : *quick ? "short" : "long");
         if (!*stop) {

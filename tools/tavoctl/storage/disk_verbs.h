@@ -4,10 +4,6 @@
 
 #include "frame/verb.h"
 
-#include <cstdint>
-#include <optional>
-#include <string>
-
 namespace tavoctl {
 
 struct DiskHealth {

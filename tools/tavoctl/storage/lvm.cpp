@@ -3,12 +3,8 @@
 
 #include "families.h"
 #include "frame/containers.h"
-#include "frame/failure.h"
-#include "frame/program.h"
 #include "storage/device.h"
 #include "storage/volume_groups.h"
-
-#include <string_view>
 
 namespace tavoctl {
 namespace {
@@ -20,25 +16,10 @@ struct PvFacts {
     std::string volume;  // that fills the group; empty when there is none
 };
 
-std::optional<Bytes> SizeOf(const LVMPV &pv)
-{
-    uint64_t sectors = 0;
-    return DiskSizeGet(pv.szPv, &sectors) == 1 ? std::optional(Bytes{sectors * 512}) : std::nullopt;
-}
-
 constexpr Column<PvFacts> pv_columns[] = {
-    {"device",
-     [](const PvFacts &p) {
-         return DeviceName(p.pv.szPv);
-     }},
-    {"size",
-     [](const PvFacts &p) {
-         return SizeOf(p.pv);
-     }},
-    {"group",
-     [](const PvFacts &p) {
-         return Maybe(DeviceName(p.pv.szVg));
-     }},
+    {"device", [](const PvFacts &p) { return DeviceName(p.pv.szPv); }},
+    {"size", [](const PvFacts &p) { return SizeOf(p.pv.szPv); }},
+    {"group", [](const PvFacts &p) { return Maybe(DeviceName(p.pv.szVg)); }},
     {"devices", [](const PvFacts &p) { return *p.pv.szVg ? std::optional<int>(p.pv.nPv) : std::nullopt; },
      "of the group"},
     {"volume", [](const PvFacts &p) { return Maybe(p.volume); }, "that fills the group"},
@@ -109,14 +90,10 @@ Action LvmCreate(Arguments &in)
         RefuseWithoutLvm(attempted);
         const std::vector<std::string> paths = DevicePaths(*words);
         LVMVG present;
-        if (LVMVgSBGet(path.c_str(), &present) == 1)
-            throw Failure{.attempted = attempted, .reason = "it is there already"};
+        FailIf(LVMVgSBGet(path.c_str(), &present) == 1, attempted, "it is there already");
         RefuseUsed(paths, attempted);
         RefuseGrouped(paths, attempted);
-        uint64_t size = 0;
-        for (const std::string &device : paths)
-            size += SizeOfDevice(device);
-        RefuseTooLarge(size, attempted);
+        RefuseTooLarge(SizeOfAll(paths), attempted);
         call.Change(path, "devices", {}, paths);
         call.Change(path, "volume", {}, volume->value_or("lv"));
         if (call.Proceed("Lose what is on " + Joined(paths, ", ") + "?"))
@@ -176,32 +153,27 @@ Action LvmExpand(Arguments &in)
 void AddLvm(Program &program)
 {
     Family &lvm = program.Add("lvm", "Volume groups on the arrays");
-    lvm.Add("list", reads, Answer::List(pv_columns), R"(Lists the physical volumes with their group and its volume, and
+    lvm.Add("list", reads, Answer::List(pv_columns), LvmList,
+            R"(Lists the physical volumes with their group and its volume, and
 where that is mounted. While a disk is in standby nothing is read unless --wake is given.
 
-tavoctl lvm list)",
-            LvmList);
-    lvm.Add("create", changes | destroys, Answer::Change(), R"(Makes physical volumes of DEVICEs, a group of them, and
+tavoctl lvm list)");
+    lvm.Add("create", changes | destroys, LvmCreate, R"(Makes physical volumes of DEVICEs, a group of them, and
 the volume that fills it. What is on them is lost; one that is in use is refused.
 
 tavoctl lvm create vg1 md2
-tavoctl lvm create --yes --volume lv vg1 md2 md3)",
-            LvmCreate);
-    lvm.Add("remove", changes | destroys, Answer::Change(),
-            R"(Removes a group with its volumes and its physical volumes.
+tavoctl lvm create --yes --volume lv vg1 md2 md3)");
+    lvm.Add("remove", changes | destroys, LvmRemove, R"(Removes a group with its volumes and its physical volumes.
 What is on it is lost; one that is in use is refused.
 
-tavoctl lvm remove vg1)",
-            LvmRemove);
-    lvm.Add("rename", changes, Answer::Change(), R"(Renames a group.
+tavoctl lvm remove vg1)");
+    lvm.Add("rename", changes, LvmRename, R"(Renames a group.
 
-tavoctl lvm rename vg1 vg2)",
-            LvmRename);
-    lvm.Add("expand", changes, Answer::Change(), R"(Has the physical volumes of a group use the whole of their devices,
+tavoctl lvm rename vg1 vg2)");
+    lvm.Add("expand", changes, LvmExpand, R"(Has the physical volumes of a group use the whole of their devices,
 after an array has grown. The volume and its file system are not touched.
 
-tavoctl lvm expand vg1)",
-            LvmExpand);
+tavoctl lvm expand vg1)");
 }
 
 }  // namespace tavoctl

@@ -1,9 +1,10 @@
 // The volumes that are mounted.
 #include "storage/mounted_volumes.h"
 
+#include "frame/containers.h"
 #include "frame/failure.h"
+#include "frame/text.h"
 
-#include <charconv>
 #include <cstdio>
 #include <map>
 #include <memory>
@@ -18,24 +19,15 @@ constexpr std::string_view prefix = "/volume";
 // Returns 0 for a path that is not that of a volume.
 int VolumeNumber(std::string_view path)
 {
-    int number = 0;
-    if (!path.starts_with(prefix))
-        return 0;
-    const auto [stop, error] = std::from_chars(path.data() + prefix.size(), path.data() + path.size(), number);
-    return error == std::errc() && stop == path.data() + path.size() ? number : 0;
+    return path.starts_with(prefix) ? NumberIn<int>(path.substr(prefix.size())).value_or(0) : 0;
 }
-
-struct EndMounts {
-    void operator()(std::FILE *mounts) const { ::endmntent(mounts); }
-};
 
 }  // namespace
 
 std::vector<MountedVolume> MountedVolumes()
 {
-    const std::unique_ptr<std::FILE, EndMounts> mounts(::setmntent("/proc/self/mounts", "re"));
-    if (!mounts)
-        throw Failure{.attempted = "list the mounted volumes", .reason = "/proc/self/mounts cannot be read"};
+    const std::unique_ptr<std::FILE, By<::endmntent>> mounts(::setmntent("/proc/self/mounts", "re"));
+    FailIf(!mounts, "list the mounted volumes", "/proc/self/mounts cannot be read");
     std::map<int, MountedVolume> found;
     while (const mntent *mount = ::getmntent(mounts.get()))
         if (const int number = VolumeNumber(mount->mnt_dir); number > 0)

@@ -2,7 +2,7 @@
 #ifndef TAVOCTL_MOUNTED_VOLUMES_H
 #define TAVOCTL_MOUNTED_VOLUMES_H
 
-#include "frame/argument_kind.h"
+#include "frame/arguments.h"
 
 #include <string>
 #include <vector>

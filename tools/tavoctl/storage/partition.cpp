@@ -3,8 +3,6 @@
 #include "tavo_partition.h"
 
 #include "families.h"
-#include "frame/failure.h"
-#include "frame/program.h"
 #include "storage/device.h"
 #include "storage/partitions.h"
 
@@ -21,10 +19,7 @@ struct PartitionFacts {
 };
 
 constexpr Column<PartitionFacts> partition_columns[] = {
-    {"partition",
-     [](const PartitionFacts &p) {
-         return DeviceName(p.path);
-     }},
+    {"partition", [](const PartitionFacts &p) { return DeviceName(p.path); }},
     {"start", field<&PartitionFacts::start>, "", in_list, "sectors of 512 bytes"},
     {"sectors", field<&PartitionFacts::sectors>, "of 512 bytes"},
     {"size", field<&PartitionFacts::size>},
@@ -46,30 +41,12 @@ std::string TypeText(uint32_t type)
 }
 
 constexpr Column<LayoutFacts> layout_columns[] = {
-    {"version",
-     [](const LayoutFacts &l) {
-         return l.layout.nVersion;
-     }},
-    {"raid",
-     [](const LayoutFacts &l) {
-         return l.layout.fRaid != 0;
-     }},
-    {"start_1",
-     [](const LayoutFacts &l) {
-         return static_cast<int64_t>(l.layout.place1.nStart);
-     }},
-    {"sectors_1",
-     [](const LayoutFacts &l) {
-         return static_cast<int64_t>(l.layout.place1.cSector);
-     }},
-    {"start_2",
-     [](const LayoutFacts &l) {
-         return static_cast<int64_t>(l.layout.place2.nStart);
-     }},
-    {"sectors_2",
-     [](const LayoutFacts &l) {
-         return static_cast<int64_t>(l.layout.place2.cSector);
-     }},
+    {"version", [](const LayoutFacts &l) { return l.layout.nVersion; }},
+    {"raid", [](const LayoutFacts &l) { return l.layout.fRaid != 0; }},
+    {"start_1", [](const LayoutFacts &l) { return static_cast<int64_t>(l.layout.place1.nStart); }},
+    {"sectors_1", [](const LayoutFacts &l) { return static_cast<int64_t>(l.layout.place1.cSector); }},
+    {"start_2", [](const LayoutFacts &l) { return static_cast<int64_t>(l.layout.place2.nStart); }},
+    {"sectors_2", [](const LayoutFacts &l) { return static_cast<int64_t>(l.layout.place2.cSector); }},
     {"gap", [](const LayoutFacts &l) { return static_cast<int64_t>(l.layout.cGap); }, "", in_list, "sectors"},
     {"types",
      [](const LayoutFacts &l) {
@@ -123,9 +100,7 @@ PartitionFacts DescribePartition(const std::string &disk, const std::string &pat
         partition.type = TypeText(type);
         partition.name = TypeNameOf(type);
     }
-    uint64_t counted = 0;
-    if (DiskSizeGet(path.c_str(), &counted) == 1)
-        partition.size = Bytes{counted * 512};
+    partition.size = SizeOf(path);
     return partition;
 }
 
@@ -195,41 +170,37 @@ Action PartitionTable(Arguments &in)
 void AddPartition(Program &program)
 {
     Family &partition = program.Add("partition", "Partition tables of the disks");
-    partition.Add("list", reads, Answer::List(partition_columns),
+    partition.Add("list", reads, Answer::List(partition_columns), PartitionList,
                   R"(Lists the partitions of a disk, or of all. Of a disk
 in standby only what the kernel knows is shown, unless --wake is given.
 
 tavoctl partition list
-tavoctl partition list --json sda)",
-                  PartitionList);
-    partition.Add("layout", reads, Answer::List(layout_columns).OrOne(disk_layout_columns), R"(Shows which layout of the
+tavoctl partition list --json sda)");
+    partition.Add("layout", reads, Answer::List(layout_columns).OrOne(disk_layout_columns), PartitionLayout,
+                  R"(Shows which layout of the
 system a disk carries. Without DISK: every layout there has been, in sectors of 512 bytes, and which one new disks get.
 
 tavoctl partition layout sda
-tavoctl partition layout)",
-                  PartitionLayout);
-    partition.Add("create", changes | destroys, Answer::Change(), R"(Makes the system's partitions on disks: 1 and 2 for
+tavoctl partition layout)");
+    partition.Add("create", changes | destroys, PartitionMake, R"(Makes the system's partitions on disks: 1 and 2 for
 the system, on an empty table, and 3 for data. --system and --data make these alone; --system also loses a data
 partition. What is on the disks is lost. A disk that is in use is refused.
 
 tavoctl partition create sdb
 tavoctl partition create --yes sda sdb sdc sdd
 tavoctl partition create --system --version 6 sdb
-tavoctl partition create --yes --data sdb)",
-                  PartitionMake);
-    partition.Add("clean", changes | destroys, Answer::Change(),
-                  R"(Empties entries of a disk's partition table and erases
+tavoctl partition create --yes --data sdb)");
+    partition.Add("clean", changes | destroys, PartitionErase, R"(Empties entries of a disk's partition table and erases
 the RAID superblocks there. --data empties partitions 3 and up, --system all. --table only writes an empty table. What
 is in use is refused.
 
 tavoctl partition clean --data sdb
-tavoctl partition clean --yes --system sdb)",
-                  PartitionErase);
-    partition.Add("table", reads, Answer::One(disk_table_columns), R"(Prints the kind of a disk's partition table: none,
+tavoctl partition clean --yes --system sdb)");
+    partition.Add("table", reads, Answer::One(disk_table_columns), PartitionTable,
+                  R"(Prints the kind of a disk's partition table: none,
 mbr or gpt.
 
-tavoctl partition table sda)",
-                  PartitionTable);
+tavoctl partition table sda)");
 }
 
 }  // namespace tavoctl

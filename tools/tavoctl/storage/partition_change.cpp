@@ -3,7 +3,6 @@
 #include "tavo_partition.h"
 
 #include "frame/containers.h"
-#include "frame/failure.h"
 #include "storage/device.h"
 #include "storage/partitions.h"
 
@@ -23,8 +22,7 @@ std::vector<std::string> PartitionsOf(const std::string &disk)
     const std::string name = DeviceName(disk);
     const PARTITIONFILTER filter = {name.c_str(), 0};
     StringList paths;
-    if (PartitionPathEnum(&filter, paths.Address()) < 0)
-        throw LibraryFailure("list the partitions of " + disk);
+    Must(PartitionPathEnum(&filter, paths.Address()) >= 0, "list the partitions of " + disk);
     std::vector<std::string> partitions;
     for (const std::string &path : paths.Items()) {
         const std::string rest = path.substr(std::min(path.size(), disk.size()));
@@ -39,9 +37,8 @@ namespace {
 // Either the system's two partitions or the data partition: in one go the one would undo the other.
 int FlagsOf(bool system, bool data, const std::string &attempted)
 {
-    if (system == data)
-        throw UsageFailure(attempted, system ? "--system would undo --data" : "--system or --data is required",
-                           "first --system, then --data");
+    RefuseIf(system == data, attempted, system ? "--system would undo --data" : "--system or --data is required",
+             "first --system, then --data");
     return system ? PARTITION_SYSTEM : PARTITION_DATA;
 }
 
@@ -52,11 +49,9 @@ void RequireTool(const std::string &attempted)
     struct stat in_place = {}, installed = {};
     const bool missing = ::stat(partitioning_tool, &in_place) != 0;
     const bool aside = ::stat("/usr/lib/tavo-appliance/sfdisk", &installed) == 0;
-    if (missing || (aside && (in_place.st_ino != installed.st_ino || in_place.st_dev != installed.st_dev)))
-        throw Failure{.attempted = attempted,
-                      .reason = std::string(partitioning_tool) +
-                                (missing ? " is missing" : " is not the appliance's own tool"),
-                      .hint = "run tavo-appliance-setup, of the package tavo-appliance"};
+    FailIf(missing || (aside && (in_place.st_ino != installed.st_ino || in_place.st_dev != installed.st_dev)),
+           attempted, std::string(partitioning_tool) + (missing ? " is missing" : " is not the appliance's own tool"),
+           "run tavo-appliance-setup, of the package tavo-appliance");
 }
 
 std::vector<std::string> DataPartitions(const std::string &disk)
@@ -77,9 +72,7 @@ Action PartitionMake(Arguments &in)
         in.Number("--version", "VERSION", "of the layout; 0: the one that the system carries (0)", 0, 99);
     return [=](Call &call) {
         RequireTool("make partitions on " + Joined(*words, ", "));
-        std::vector<std::string> paths;
-        for (const std::string &word : *words)
-            paths.push_back(DiskPath(word));
+        const std::vector<std::string> paths = DiskPaths(*words);
         const std::string attempted = "make partitions on " + Joined(paths, ", ");
         // In one call for both the second would undo the first.
         std::vector<int> steps;
@@ -88,18 +81,16 @@ Action PartitionMake(Arguments &in)
         if (*data || !*system)
             steps.push_back(PARTITION_DATA);
         int layout = static_cast<int>(version->value_or(0));
-        if (TAVOPartitionLayoutIdxGet(layout, LVMIsSupport()) < 0)
-            throw UsageFailure(attempted, "there is no layout of version " + std::to_string(layout),
-                               "tavoctl partition layout shows them");
+        RefuseIf(TAVOPartitionLayoutIdxGet(layout, LVMIsSupport()) < 0, attempted,
+                 "there is no layout of version " + std::to_string(layout), "tavoctl partition layout shows them");
         // Partition 3 is made after the others, which may be in use.
         const bool empties = steps[0] == PARTITION_SYSTEM;
         if (empties)
             RefuseUsed(paths, attempted);
         for (const std::string &path : paths) {
-            RefuseTooLarge(SizeOfDevice(path), attempted);
-            if (!empties && PartitionsOf(path).size() > 2)
-                throw Failure{
-                    .attempted = attempted, .reason = path + " has a data partition", .hint = "clean it first"};
+            RefuseTooLarge(SizeOfAll({path}), attempted);
+            FailIf(!empties && PartitionsOf(path).size() > 2, attempted, path + " has a data partition",
+                   "clean it first");
             call.Change(path, "partitions", PartitionsOf(path), !empties ? "3" : steps.size() > 1 ? "1, 2, 3" : "1, 2");
         }
         const std::string all = Joined(paths, ", ");
@@ -122,8 +113,7 @@ Action PartitionErase(Arguments &in)
         RequireTool("clean " + *disk);
         const std::string path = DiskPath(*disk);
         const std::string attempted = "clean " + path;
-        if (*table && (*system || *data))
-            throw UsageFailure(attempted, "--table excludes --system and --data");
+        RefuseIf(*table && (*system || *data), attempted, "--table excludes --system and --data");
         const int flags = *table ? 0 : FlagsOf(*system, *data, attempted);
         const bool some = flags == PARTITION_DATA;
         RefuseUsed(some ? DataPartitions(path) : std::vector<std::string>{path}, attempted);

@@ -4,9 +4,6 @@
 
 #include "frame/verb.h"
 
-#include <string>
-#include <vector>
-
 namespace tavoctl {
 
 int NumberOf(const std::string &partition);  // 3 of "/dev/sda3"

@@ -2,7 +2,6 @@
 #include "tavo_appliance.h"
 
 #include "frame/containers.h"
-#include "frame/failure.h"
 #include "storage/arrays.h"
 #include "storage/device.h"
 #include "storage/raid_verbs.h"
@@ -16,14 +15,6 @@ namespace {
 bool Contains(const std::vector<std::string> &paths, const std::string &path)
 {
     return std::find(paths.begin(), paths.end(), path) != paths.end();
-}
-
-bool IsRunning(const std::string &path)
-{
-    RAIDINFO *info = nullptr;
-    const bool runs = RAIDInfoGet(path.c_str(), &info) == 1;
-    RAIDInfoFree(info);
-    return runs;
 }
 
 std::string LossOf(const std::vector<std::string> &paths)
@@ -43,15 +34,13 @@ void RefuseTwice(std::vector<std::string> paths, const std::string &attempted)
 uint64_t SizeToBe(int level, const std::vector<std::string> &paths, int slots, uint64_t limit)
 {
     uint64_t least = limit ? limit : ~uint64_t{0};
-    uint64_t sum = 0;
     for (const std::string &path : paths) {
-        least = std::min(least, SizeOfDevice(path));
-        sum += SizeOfDevice(path);
+        least = std::min(least, SizeOfAll({path}));
     }
     switch (level) {
     case RAID_LEVEL_0:
     case RAID_LEVEL_LINEAR:
-        return sum;
+        return SizeOfAll(paths);
     case RAID_LEVEL_10:
         return least * static_cast<uint64_t>(slots) / 2;
     default:
@@ -92,10 +81,8 @@ void GrowSlots(Call &call, const RAIDINFO &array, const std::vector<std::string>
     constexpr uint64_t least = uint64_t{1} << 30;
     const std::string name = array.szPath;
     const int slots = array.nSlot + static_cast<int>(paths.size());
-    if (array.fLevel != RAID_LEVEL_1 && array.cbMember < least)
-        throw Failure{.attempted = attempted,
-                      .reason = "it uses less than 1 GiB of each member, and a power failure meanwhile could damage it",
-                      .hint = "make a new array"};
+    FailIf(array.fLevel != RAID_LEVEL_1 && array.cbMember < least, attempted,
+           "it uses less than 1 GiB of each member, and a power failure meanwhile could damage it", "make a new array");
     RefuseTwice(paths, attempted);
     RefuseUsed(paths, attempted);
     RefuseTooLarge(SizeToBe(array.fLevel, {}, slots, array.cbMember), attempted);
@@ -123,12 +110,10 @@ Action RaidCreate(Arguments &in)
     return [=](Call &call) {
         const std::string path = ArrayPath(*word);
         const std::string attempted = "make the array " + path;
-        if (!*level)
-            throw UsageFailure(attempted, "--level is required", "0, 1, 5, 6, 10 or linear");
+        RefuseIf(!*level, attempted, "--level is required", "0, 1, 5, 6, 10 or linear");
         const std::vector<std::string> paths = DevicePaths(*words);
         RefuseTwice(paths, attempted);
-        if (IsRunning(path))
-            throw BusyFailure(attempted, "it runs", "stop it first");
+        BusyIf(Runs(path), attempted, "it runs", "stop it first");
         RefuseUsed(paths, attempted);
         const auto spare = static_cast<int>(spares->value_or(0));
         const int active = std::max(static_cast<int>(paths.size()) - spare, 1);
@@ -160,8 +145,7 @@ Action RaidAdd(Arguments &in)
         const Array array = ReadArray(ArrayPath(*word));
         const std::vector<std::string> paths = DevicePaths(*words);
         const std::string attempted = "add " + Joined(paths, ", ") + " to " + array->szPath;
-        if (array->fLevel == RAID_LEVEL_0)
-            throw Failure{.attempted = attempted, .reason = "a RAID 0 takes no members"};
+        FailIf(array->fLevel == RAID_LEVEL_0, attempted, "a RAID 0 takes no members");
         RefuseUsed(paths, attempted);
         for (const std::string &path : paths)
             call.Change(array->szPath, "members", {}, path);
@@ -192,8 +176,7 @@ Action RaidTakeOut(Arguments &in)
         const std::string attempted = "remove " + Joined(paths, ", ") + " from " + name;
         const std::vector<std::string> active = Members(*array, RAID_MEMBER_ACTIVE);
         for (const std::string &path : paths) {
-            if (Contains(active, path))
-                throw BusyFailure(attempted, path + " is in sync");
+            BusyIf(Contains(active, path), attempted, path + " is in sync");
             if (!Contains(all, path))
                 throw NotFound(attempted, ERR_PATH_NOT_FOUND, path + " is not a member");
             call.Change(name, "members", path, {});
@@ -214,14 +197,11 @@ Action RaidGrow(Arguments &in)
         const Array array = ReadArray(ArrayPath(*word));
         const std::string name = array->szPath;
         const std::string attempted = "grow " + name;
-        if ((array->fLevel & (RAID_LEVEL_1 | RAID_LEVEL_5 | RAID_LEVEL_6)) == 0)
-            throw Failure{.attempted = attempted, .reason = "a " + LevelText(array->fLevel) + " does not grow"};
-        if (array->fRebuilding)
-            throw BusyFailure(attempted, "it is being rebuilt", "tavoctl raid wait waits for the end");
-        if (array->nStatus != RAID_STATUS_NORMAL)
-            throw Failure{.attempted = attempted,
-                          .reason = std::string("it is ") + StatusText(array->nStatus),
-                          .hint = "tavoctl raid replace gives it a new disk"};
+        FailIf((array->fLevel & (RAID_LEVEL_1 | RAID_LEVEL_5 | RAID_LEVEL_6)) == 0, attempted,
+               "a " + LevelText(array->fLevel) + " does not grow");
+        BusyIf(array->fRebuilding, attempted, "it is being rebuilt", "tavoctl raid wait waits for the end");
+        FailIf(array->nStatus != RAID_STATUS_NORMAL, attempted, std::string("it is ") + StatusText(array->nStatus),
+               "tavoctl raid replace gives it a new disk");
         const std::vector<std::string> paths = DevicePaths(*words);
         paths.empty() ? GrowMembers(call, *array, attempted) : GrowSlots(call, *array, paths, attempted);
         if (*wait && !call.dry_run)
@@ -236,8 +216,7 @@ Action RaidMigrate(Arguments &in)
     return [=](Call &call) {
         const Array array = ReadArray(ArrayPath(*word));
         const std::string attempted = std::string("turn ") + array->szPath + " into a RAID 6";
-        if (array->fLevel != RAID_LEVEL_5)
-            throw Failure{.attempted = attempted, .reason = "it is a " + LevelText(array->fLevel)};
+        FailIf(array->fLevel != RAID_LEVEL_5, attempted, "it is a " + LevelText(array->fLevel));
         const std::vector<std::string> paths = DevicePaths(*words);
         RefuseUsed(paths, attempted);
         call.Change(array->szPath, "level", LevelText(array->fLevel), LevelText(RAID_LEVEL_6));
@@ -267,14 +246,13 @@ Action RaidErase(Arguments &in)
     const auto words = in.Texts("MEMBER", device_kind, member_help, 0);
     const auto uuid = in.Option("--uuid", "UUID", any_text, "of an array that does not run");
     return [=](Call &call) {
-        if (words->empty() == !*uuid)
-            throw UsageFailure("erase superblocks", "name members, or use --uuid");
+        RefuseIf(words->empty() == !*uuid, "erase superblocks", "name members, or use --uuid");
         if (*uuid) {
             const std::string attempted = "erase the superblocks of array " + **uuid;
             for (const Array &array : ReadArrays()) {
                 char found[64];
-                if (RAIDUUIDGet(array->szPath, found, sizeof found) == 1 && **uuid == found)
-                    throw BusyFailure(attempted, std::string(array->szPath) + " runs", "stop it first");
+                BusyIf(RAIDUUIDGet(array->szPath, found, sizeof found) == 1 && **uuid == found, attempted,
+                       std::string(array->szPath) + " runs", "stop it first");
             }
             call.Change("the members of " + **uuid, "superblock", **uuid, {});
             if (call.Proceed("Erase all superblocks of array " + **uuid + "?"))

@@ -1,5 +1,4 @@
 // tavoctl raid: starting arrays after a power failure, and new disks for failed ones.
-#include "frame/failure.h"
 #include "storage/arrays.h"
 #include "storage/device.h"
 #include "storage/raid_verbs.h"
@@ -12,14 +11,6 @@
 
 namespace tavoctl {
 namespace {
-
-bool Runs(const std::string &path)
-{
-    RAIDINFO *info = nullptr;
-    const bool runs = RAIDInfoGet(path.c_str(), &info) == 1;
-    RAIDInfoFree(info);
-    return runs;
-}
 
 std::string ForceHint(const std::string &path)
 {
@@ -36,9 +27,7 @@ std::string ShortOf(const StoppedArray &array)
 // Why an array must not be started without being asked; empty when it may.
 std::string WhyNot(const StoppedArray &array, const std::vector<StoppedArray> &all)
 {
-    const auto same_name = [&](const StoppedArray &other) {
-        return other.path == array.path;
-    };
+    const auto same_name = [&](const StoppedArray &other) { return other.path == array.path; };
     if (array.path.empty())
         return "its name holds no number: tavoctl raid assemble ARRAY " + array.uuid;
     if (Runs(array.path) || std::count_if(all.begin(), all.end(), same_name) > 1)
@@ -104,8 +93,7 @@ StoppedArray FindStopped(const std::string &path, const std::string &uuid, bool 
             found.push_back(array);
     if (found.empty())
         throw NotFound(attempted, ERR_PATH_NOT_FOUND, "tavoctl raid list --all shows the arrays that there are");
-    if (found.size() > 1)
-        throw UsageFailure(attempted, "several arrays have this name", "name the UUID, too");
+    RefuseIf(found.size() > 1, attempted, "several arrays have this name", "name the UUID, too");
     return found[0];
 }
 
@@ -141,23 +129,20 @@ void ForceStart(Call &call, const std::string &path, const StoppedArray &array)
 std::string OldMember(const RAIDINFO &info, const std::string &word, const std::string &attempted)
 {
     const std::vector<std::string> active = Members(info, RAID_MEMBER_ACTIVE);
-    const auto is_gone = [](const std::string &path) {
-        return !std::filesystem::exists(path);
-    };
+    const auto is_gone = [](const std::string &path) { return !std::filesystem::exists(path); };
     if (word.empty()) {
         std::vector<std::string> gone = Members(info, RAID_MEMBER_FAILED | RAID_MEMBER_FATAL);
         std::copy_if(active.begin(), active.end(), std::back_inserter(gone), is_gone);
-        if (gone.size() > 1)
-            throw UsageFailure(attempted, Joined(gone, ", ") + " are gone", "name the one that is replaced first");
-        if (gone.empty() && static_cast<int>(Members(info, ~0).size()) >= info.nSlot)
-            throw Failure{.attempted = attempted, .reason = "no member has failed or was pulled, and no slot is free"};
+        RefuseIf(gone.size() > 1, attempted, Joined(gone, ", ") + " are gone", "name the one that is replaced first");
+        FailIf(gone.empty() && static_cast<int>(Members(info, ~0).size()) >= info.nSlot, attempted,
+               "no member has failed or was pulled, and no slot is free");
         return gone.empty() ? "" : gone[0];
     }
     const std::string path = MemberOf(info, word);
     if (path.empty())
         throw NotFound(attempted, ERR_PATH_NOT_FOUND, DevicePath(word) + " is not a member");
-    if (std::find(active.begin(), active.end(), path) != active.end() && !is_gone(path))
-        throw BusyFailure(attempted, path + " is in sync");
+    BusyIf(std::find(active.begin(), active.end(), path) != active.end() && !is_gone(path), attempted,
+           path + " is in sync");
     return path;
 }
 
@@ -171,8 +156,8 @@ Action RaidStart(Arguments &in)
     const auto force = in.Flag("--force", "also when its members disagree; asks");
     const auto wake = in.Flag("--wake", "read the disks although that wakes them");
     return [=](Call &call) {
-        if (*all + word->has_value() != 1 || (*all && *force))
-            throw UsageFailure("start arrays", "name an array, or use --all without --force");
+        RefuseIf(*all + word->has_value() != 1 || (*all && *force), "start arrays",
+                 "name an array, or use --all without --force");
         if (*all)
             return StartAll(call, *wake);
         const std::string path = ArrayPath(**word);
@@ -199,10 +184,9 @@ Action RaidReplace(Arguments &in)
         const Array array = ReadArray(ArrayPath(*word));
         const std::string name = array->szPath;
         const std::string attempted = "replace a member of " + name;
-        if (words->size() > 2)
-            throw UsageFailure(attempted, "one disk takes the place of one member");
-        if (!disk_kind.valid(words->back()))
-            throw UsageFailure(attempted, words->back() + " is not a whole disk", "name the disk, such as sdd");
+        RefuseIf(words->size() > 2, attempted, "one disk takes the place of one member");
+        RefuseIf(!disk_kind.valid(words->back()), attempted, words->back() + " is not a whole disk",
+                 "name the disk, such as sdd");
         const std::string disk = DiskPath(words->back());
         const std::string old = OldMember(*array, words->size() == 2 ? words->front() : "", attempted);
         if (const std::string member = MemberOf(*array, disk); !member.empty() && member != old)

@@ -4,9 +4,6 @@
 
 #include "frame/verb.h"
 
-#include <cstdint>
-#include <string>
-
 namespace tavoctl {
 
 Action RaidCreate(Arguments &in);

@@ -1,6 +1,6 @@
 // tavoctl raid: rebuilds and scrubs, started, slowed and waited for.
-#include "frame/failure.h"
-#include "frame/progress.h"
+#include "frame/files.h"
+#include "frame/terminal.h"
 #include "storage/arrays.h"
 #include "storage/device.h"
 #include "storage/raid_verbs.h"
@@ -27,10 +27,8 @@ void WaitFrom(Clock::time_point start, const std::string &path, int64_t timeout)
             return;
         // A spare that has just come is rebuilt onto after a moment.
         const bool begins = array->nStatus == RAID_STATUS_DEGRADED && !Members(*array, RAID_MEMBER_SPARE).empty();
-        if (!busy && !(begins && quiet < most_quiet))
-            throw Failure{.attempted = attempted, .reason = std::string("it is ") + StatusText(array->nStatus)};
-        if (timeout > 0 && Clock::now() - start >= std::chrono::seconds(timeout))
-            throw BusyFailure(attempted, "the time is up");
+        FailIf(!busy && !(begins && quiet < most_quiet), attempted, std::string("it is ") + StatusText(array->nStatus));
+        BusyIf(timeout > 0 && Clock::now() - start >= std::chrono::seconds(timeout), attempted, "the time is up");
         const auto rebuild = RebuildOf(*array);
         progress.Show(ActionOf(*array) + " " + (rebuild ? rebuild->Text() : "begins"));
     }
@@ -82,14 +80,12 @@ Action RaidScrub(Arguments &in)
         const std::string path = array->szPath;
         const std::string attempted = (*stop ? "end the scrub of " : "scrub ") + path;
         const std::string action = ActionOf(*array);
-        if (*stop && *wait)
-            throw UsageFailure(attempted, "--stop excludes --wait");
-        if ((array->fLevel & (RAID_LEVEL_0 | RAID_LEVEL_LINEAR)) != 0)
-            throw Failure{.attempted = attempted,
-                          .reason = "a " + LevelText(array->fLevel) + " has nothing to compare"};
+        RefuseIf(*stop && *wait, attempted, "--stop excludes --wait");
+        FailIf((array->fLevel & (RAID_LEVEL_0 | RAID_LEVEL_LINEAR)) != 0, attempted,
+               "a " + LevelText(array->fLevel) + " has nothing to compare");
         const bool runs = action == "check";
-        if (!*stop && !runs && !action.empty())
-            throw BusyFailure(attempted, "it is being rebuilt (" + action + ")", "tavoctl raid wait waits for the end");
+        BusyIf(!*stop && !runs && !action.empty(), attempted, "it is being rebuilt (" + action + ")",
+               "tavoctl raid wait waits for the end");
         if (runs == *stop)
             call.Change(path, "action", Maybe(action), *stop ? std::nullopt : std::optional(std::string("check")));
         if (call.Proceed())
@@ -112,20 +108,15 @@ Action RaidSpeed(Arguments &in)
     return [=](Call &call) {
         const Array array = ReadArray(ArrayPath(*word));
         const std::string attempted = std::string("set the speed of ") + array->szPath;
-        if (!*least && !*most)
-            throw UsageFailure(attempted, "--least or --most is required");
-        if (least->value_or(0) > 0 && most->value_or(0) > 0 && **least > **most)
-            throw UsageFailure(attempted, "--least is more than --most");
+        RefuseIf(!*least && !*most, attempted, "--least or --most is required");
+        RefuseIf(least->value_or(0) > 0 && most->value_or(0) > 0 && **least > **most, attempted,
+                 "--least is more than --most");
         const struct {
             const char *column, *file;
             std::optional<int64_t> wanted;
         } settings[] = {{"least_speed", "sync_speed_min", *least}, {"most_speed", "sync_speed_max", *most}};
-        const auto file = [&](const auto &setting) {
-            return ArrayFile(array->szPath, setting.file);
-        };
-        const auto text = [](int64_t wanted) {
-            return wanted ? std::to_string(wanted) : "system";
-        };
+        const auto file = [&](const auto &setting) { return ArrayFile(array->szPath, setting.file); };
+        const auto text = [](int64_t wanted) { return wanted ? std::to_string(wanted) : "system"; };
         for (const auto &setting : settings) {
             // "200000 (system)", "1000 (local)"
             const std::string now = KernelText(file(setting)).value_or("");

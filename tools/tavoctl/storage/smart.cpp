@@ -4,8 +4,7 @@
 #include "tavo_disk.h"
 
 #include "frame/failure.h"
-
-#include <unistd.h>
+#include "frame/files.h"
 
 namespace tavoctl {
 namespace {
@@ -17,13 +16,9 @@ constexpr int first_slot = 2;
 
 bool ReadThresholds(const std::string &disk, unsigned char (&page)[page_size])
 {
-    const int fd = TAVOIDiskRawOpen(disk.c_str());
-    if (fd < 0)
-        return false;
+    const Descriptor drive(TAVOIDiskRawOpen(disk.c_str()));
     const auto command = TAVODiskIsMvSocDriver(disk.c_str()) == 1 ? marvell_command_interface : ata_command_interface;
-    const bool read = command(fd, DISK_COMMAND_SMART_THRESHOLDS, page) == 0;
-    ::close(fd);
-    return read;
+    return drive.IsOpen() && command(drive.Get(), DISK_COMMAND_SMART_THRESHOLDS, page) == 0;
 }
 
 int ThresholdOf(const unsigned char (&page)[page_size], int id)
@@ -52,8 +47,7 @@ std::vector<SmartAttribute> ReadSmart(const std::string &disk, const std::string
 {
     unsigned char data[page_size] = {};
     unsigned char thresholds[page_size] = {};
-    if (SmartDataRead(disk.c_str(), data, 0) != 0)
-        throw Failure{.attempted = attempted, .reason = "the drive does not give it"};
+    FailIf(SmartDataRead(disk.c_str(), data, 0) != 0, attempted, "the drive does not give it");
     const bool has_thresholds = ReadThresholds(disk, thresholds);
     std::vector<SmartAttribute> attributes;
     for (int i = 0; i < slots; ++i) {

@@ -95,10 +95,9 @@ Verdict Judge(const std::vector<SmartAttribute> &attributes, const SelfTest &tes
 
 const char *SmartName(int id)
 {
-    for (const Name &known : names) {
+    for (const Name &known : names)
         if (known.id == id)
             return known.name;
-    }
     return "";
 }
 

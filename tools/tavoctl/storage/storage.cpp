@@ -2,7 +2,6 @@
 #include "tavo_disk.h"
 
 #include "families.h"
-#include "frame/program.h"
 #include "storage/arrays.h"
 #include "storage/disk_facts.h"
 #include "storage/partitions.h"
@@ -71,14 +70,7 @@ class Tree {
 
     static std::string MemberState(int state)
     {
-        switch (state) {
-        case RAID_MEMBER_ACTIVE:
-            return "active";
-        case RAID_MEMBER_SPARE:
-            return "spare";
-        default:
-            return "failed";
-        }
+        return state == RAID_MEMBER_ACTIVE ? "active" : state == RAID_MEMBER_SPARE ? "spare" : "failed";
     }
 
     // The array that a device is a member of, and as what.
@@ -118,9 +110,7 @@ class Tree {
         AddArrayOf(disk.path, row);
         for (const std::string &partition : PartitionsOf(disk.path)) {
             Node part = {.name = DeviceName(partition), .kind = "partition", .parents = {name}};
-            uint64_t sectors = 0;
-            if (DiskSizeGet(partition.c_str(), &sectors) == 1)
-                part.size = Bytes{sectors * 512};
+            part.size = SizeOf(partition);
             LookAt(part, partition);
             AddArrayOf(partition, Add(std::move(part), row));
         }
@@ -165,9 +155,7 @@ class Tree {
     void AddGroup(const std::string &group, int above)
     {
         shown_.insert(group);
-        const auto of_group = [&](const Volume &volume) {
-            return volume.group == group;
-        };
+        const auto of_group = [&](const Volume &volume) { return volume.group == group; };
         const Volume &first = *std::find_if(volumes_.begin(), volumes_.end(), of_group);
         const int row = Add({.name = group, .kind = "group", .parents = first.devices}, above);
         for (const Volume &volume : volumes_) {
@@ -197,9 +185,7 @@ class Tree {
 
 Action StorageShow(Arguments &)
 {
-    return [](Call &call) {
-        call.Print(StorageTree());
-    };
+    return [](Call &call) { call.Print(StorageTree()); };
 }
 
 }  // namespace
@@ -218,14 +204,13 @@ std::vector<ColumnFacts> StorageColumns()
 void AddStorage(Program &program)
 {
     program.Add("storage", "Everything from the bays to the volumes")
-        .Add("", reads, Answer::List(node_columns),
+        .Add("", reads, Answer::List(node_columns), StorageShow,
              R"(Shows what is in each bay and what it is used for, as a tree: disk,
 partition, array, group, volume. An array is shown once, below its first member that is there. No sleeping disk is
 woken; while one sleeps, groups that are not active are not shown.
 
 tavoctl storage
-tavoctl storage --json)",
-             StorageShow);
+tavoctl storage --json)");
 }
 
 }  // namespace tavoctl

@@ -1,7 +1,6 @@
 // The system's own tools.
 #include "storage/system_tool.h"
 
-#include "frame/exit_status.h"
 #include "frame/failure.h"
 
 #include <cerrno>
@@ -62,8 +61,7 @@ ToolResult TryTool(const std::vector<std::string> &words)
 std::string RunTool(const std::vector<std::string> &words, const std::string &attempted)
 {
     ToolResult result = TryTool(words);
-    if (result.status != 0)
-        throw Failure{.attempted = attempted, .reason = words[0] + ": " + result.Reason()};
+    FailIf(result.status != 0, attempted, words[0] + ": " + result.Reason());
     return std::move(result.output);
 }
 

@@ -1,7 +1,5 @@
 // tavoctl volume: the file systems where services and users keep their data.
 #include "families.h"
-#include "frame/failure.h"
-#include "frame/program.h"
 #include "storage/device.h"
 #include "storage/mounted_volumes.h"
 #include "storage/volume_verbs.h"
@@ -14,10 +12,7 @@ namespace tavoctl {
 namespace {
 
 constexpr Column<Volume> volume_columns[] = {
-    {"volume",
-     [](const Volume &v) {
-         return v.Number();
-     }},
+    {"volume", [](const Volume &v) { return v.Number(); }},
     {"path", [](const Volume &v) { return Maybe(v.mount); }, "where it is mounted"},
     {"device", field<&Volume::device>},
     {"group", field<&Volume::group>, "", in_details},
@@ -66,8 +61,7 @@ Action VolumeCheck(Arguments &in)
         const int number = std::stoi(*word);
         const std::string attempted = "check " + VolumePath(number);
         const Volume volume = FindStoredVolume(number, attempted);
-        if (!volume.mount.empty())
-            throw BusyFailure(attempted, "it is mounted on " + volume.mount, "tavoctl volume unmount " + *word);
+        BusyIf(!volume.mount.empty(), attempted, "it is mounted on " + volume.mount, "tavoctl volume unmount " + *word);
         const bool mends = *repair && !call.dry_run;
         const ActiveVolume active(volume, attempted);
         const ToolResult done = TryTool({"/sbin/e2fsck", "-f", mends ? "-y" : "-n", volume.device});
@@ -94,40 +88,36 @@ Action VolumeCheck(Arguments &in)
 void AddVolume(Program &program)
 {
     Family &volume = program.Add("volume", "Volumes: the file systems on the arrays");
-    volume.Add("list", reads, Answer::List(volume_columns), R"(Lists the volumes: where each is mounted, what it is on,
+    volume.Add("list", reads, Answer::List(volume_columns), VolumeList,
+               R"(Lists the volumes: where each is mounted, what it is on,
 and how much room it has. While a disk is in standby only those that the kernel has are listed, unless --wake is given.
 
-tavoctl volume list)",
-               VolumeList);
-    volume.Add("create", changes | destroys, Answer::Change(), R"(Makes a volume of DEVICEs, usually one array: a volume
+tavoctl volume list)");
+    volume.Add("create", changes | destroys, VolumeCreate, R"(Makes a volume of DEVICEs, usually one array: a volume
 group, the logical volume that fills it, and an ext4 file system, which is mounted. What is on them is lost; one that is
 in use is refused.
 
 tavoctl volume create 1 md2
-tavoctl volume create --yes 2 md3 md4)",
-               VolumeCreate);
-    volume.Add("mount", changes, Answer::Change(), R"(Mounts a volume, after a start of the system for example. --all
+tavoctl volume create --yes 2 md3 md4)");
+    volume.Add("mount", changes, VolumeMount, R"(Mounts a volume, after a start of the system for example. --all
 mounts all there are.
 
 tavoctl volume mount 1
-tavoctl volume mount --all)",
-               VolumeMount);
-    volume.Add("unmount", changes, Answer::Change(), R"(Unmounts a volume and lets go of its devices, so that its arrays
+tavoctl volume mount --all)");
+    volume.Add("unmount", changes, VolumeUnmount, R"(Unmounts a volume and lets go of its devices, so that its arrays
 can be stopped. One with open files is refused; services that use it are stopped first.
 
-tavoctl volume unmount 1)",
-               VolumeUnmount);
-    volume.Add("grow", changes, Answer::Change(), R"(Has a mounted volume use the whole of its devices, after an array
+tavoctl volume unmount 1)");
+    volume.Add("grow", changes, VolumeGrow, R"(Has a mounted volume use the whole of its devices, after an array
 has grown. It stays in use meanwhile.
 
-tavoctl volume grow 1)",
-               VolumeGrow);
-    volume.Add("check", changes, Answer::One(check_columns), R"(Checks the file system of a volume that is not mounted;
+tavoctl volume grow 1)");
+    volume.Add("check", changes, Answer::One(check_columns), VolumeCheck,
+               R"(Checks the file system of a volume that is not mounted;
 exit status 1 when it is damaged. Nothing is written unless --repair is given.
 
 tavoctl volume check 1
-tavoctl volume check --repair 1)",
-               VolumeCheck);
+tavoctl volume check --repair 1)");
 }
 
 }  // namespace tavoctl

@@ -2,7 +2,6 @@
 #include "tavo_lvm.h"
 
 #include "frame/containers.h"
-#include "frame/failure.h"
 #include "storage/device.h"
 #include "storage/mounted_volumes.h"
 #include "storage/volume_groups.h"
@@ -20,14 +19,6 @@ namespace tavoctl {
 namespace {
 
 constexpr char volume_name[] = "lv";
-
-uint64_t SizeOfAll(const std::vector<std::string> &paths)
-{
-    uint64_t size = 0;
-    for (const std::string &path : paths)
-        size += SizeOfDevice(path);
-    return size;
-}
 
 void MountAt(const std::string &device, const std::string &place, const std::string &attempted)
 {
@@ -48,8 +39,7 @@ void MountVolume(const Volume &volume, const std::string &place)
 void RefuseMounted(const std::string &place, const std::string &attempted)
 {
     for (const Mount &mount : Mounts())
-        if (mount.place == place)
-            throw BusyFailure(attempted, mount.source + " is mounted there");
+        BusyIf(mount.place == place, attempted, mount.source + " is mounted there");
 }
 
 // The numbers that pvs prints, in a row for each device.
@@ -128,10 +118,8 @@ Action VolumeCreate(Arguments &in)
         RefuseMounted(place, attempted);
         const std::vector<std::string> paths = DevicePaths(*words);
         LVMVG present;
-        if (LVMVgSBGet(group.c_str(), &present) == 1)
-            throw Failure{.attempted = attempted,
-                          .reason = "the group " + group + " is there already",
-                          .hint = "tavoctl volume mount mounts it; tavoctl lvm remove removes it"};
+        FailIf(LVMVgSBGet(group.c_str(), &present) == 1, attempted, "the group " + group + " is there already",
+               "tavoctl volume mount mounts it; tavoctl lvm remove removes it");
         RefuseUsed(paths, attempted);
         RefuseGrouped(paths, attempted);
         RefuseTooLarge(SizeOfAll(paths), attempted);
@@ -161,8 +149,7 @@ Action VolumeMount(Arguments &in)
     const auto word = in.OptionalText("VOLUME", volume_kind, volume_help);
     const auto all = in.Flag("--all", "every volume");
     return [=](Call &call) {
-        if (*all + word->has_value() != 1)
-            throw UsageFailure("mount volumes", "name one, or use --all");
+        RefuseIf(*all + word->has_value() != 1, "mount volumes", "name one, or use --all");
         std::vector<Volume> volumes;
         if (*all)
             volumes = ReadVolumes(true);
@@ -219,8 +206,7 @@ Action VolumeGrow(Arguments &in)
     return [=](Call &call) {
         const std::string attempted = "grow /volume" + *word;
         const Volume volume = FindStoredVolume(std::stoi(*word), attempted);
-        if (volume.mount.empty())
-            throw Failure{.attempted = attempted, .reason = "it is not mounted", .hint = "mount it first"};
+        FailIf(volume.mount.empty(), attempted, "it is not mounted", "mount it first");
         const VolumeGroup group = ReadVgInfo("/dev/" + volume.group, attempted);
         const uint64_t size = SizeToCome(volume, attempted);
         RefuseTooLarge(size, attempted);

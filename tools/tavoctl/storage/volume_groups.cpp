@@ -1,26 +1,19 @@
 // Volume groups.
 #include "storage/volume_groups.h"
 
+#include "frame/containers.h"
 #include "frame/failure.h"
-#include "frame/folder_names.h"
+#include "frame/files.h"
 #include "storage/device.h"
 
 #include <algorithm>
 
 namespace tavoctl {
-namespace {
-
-struct FreeVolumes {
-    void operator()(LVMPVLIST *list) const { LVMPvSBListFree(list); }
-};
-
-}  // namespace
-
 std::vector<LVMPV> PhysicalVolumes()
 {
     LVMPVLIST *list = nullptr;
     Must(LVMPvSBEnum(&list) >= 0, "list the physical volumes", log_hint);
-    const std::unique_ptr<LVMPVLIST, FreeVolumes> owner(list);
+    const std::unique_ptr<LVMPVLIST, By<LVMPvSBListFree>> owner(list);
     std::vector<LVMPV> volumes;
     for (const LVMPVLIST *node = list; node; node = node->pNext)
         volumes.push_back(node->pv);
@@ -38,8 +31,7 @@ std::vector<std::string> DevicesOf(const std::string &group)
 
 void RefuseWithoutLvm(const std::string &attempted)
 {
-    if (LVMIsSupport() != 1)
-        throw Failure{.attempted = attempted, .reason = "this model has no RAID and no volumes"};
+    FailIf(LVMIsSupport() != 1, attempted, "this model has no RAID and no volumes");
 }
 
 LVMVG ReadVg(const std::string &path, const std::string &attempted)
@@ -58,8 +50,7 @@ VolumeGroup ReadVgInfo(const std::string &path, const std::string &attempted)
     const LVMVG found = ReadVg(path, attempted);
     VolumeGroup record(LVMVgInfoAlloc());
     Must(record && LVMVgSB2Info(&found, record.get()) == 0, attempted, log_hint);
-    if (record->nPv == 0)
-        throw Failure{.attempted = attempted, .reason = "it has no physical volumes"};
+    FailIf(record->nPv == 0, attempted, "it has no physical volumes");
     return record;
 }
 
@@ -73,8 +64,8 @@ void RefuseUsedGroup(const std::string &path, const std::string &attempted)
 void RefuseGrouped(const std::vector<std::string> &devices, const std::string &attempted)
 {
     for (const LVMPV &pv : PhysicalVolumes())
-        if (*pv.szVg && std::find(devices.begin(), devices.end(), pv.szPv) != devices.end())
-            throw BusyFailure(attempted, std::string(pv.szPv) + " belongs to " + pv.szVg, "remove that first");
+        BusyIf(*pv.szVg && std::find(devices.begin(), devices.end(), pv.szPv) != devices.end(), attempted,
+               std::string(pv.szPv) + " belongs to " + pv.szVg, "remove that first");
 }
 
 }  // namespace tavoctl

@@ -4,16 +4,15 @@
 
 #include "tavo_lvm.h"
 
+#include "frame/containers.h"
+
 #include <memory>
 #include <string>
 #include <vector>
 
 namespace tavoctl {
 
-struct FreeGroup {
-    void operator()(LVMVGINFO *info) const { LVMVgInfoFree(info); }
-};
-using VolumeGroup = std::unique_ptr<LVMVGINFO, FreeGroup>;
+using VolumeGroup = std::unique_ptr<LVMVGINFO, By<LVMVgInfoFree>>;
 
 std::vector<LVMPV> PhysicalVolumes();
 

@@ -6,8 +6,6 @@
 #include "storage/system_tool.h"
 #include "storage/volumes.h"
 
-#include <string>
-
 namespace tavoctl {
 
 Action VolumeCreate(Arguments &in);

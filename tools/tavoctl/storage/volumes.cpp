@@ -1,13 +1,13 @@
 // The volumes.
 #include "storage/volumes.h"
 
-#include "frame/folder_names.h"
+#include "frame/files.h"
+#include "frame/text.h"
 #include "storage/device.h"
 #include "storage/volume_groups.h"
 
 #include <algorithm>
 #include <array>
-#include <charconv>
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -87,11 +87,8 @@ void AddInactive(std::vector<Volume> &volumes)
 
 std::optional<int> Volume::Number() const
 {
-    int number = 0;
-    const char *const end = group.data() + group.size();
-    if (!group.starts_with("vg") || std::from_chars(group.data() + 2, end, number).ptr != end || number < 1)
-        return std::nullopt;
-    return number;
+    const auto number = group.starts_with("vg") ? NumberIn<int>(group.substr(2)) : std::nullopt;
+    return number && *number >= 1 ? number : std::nullopt;
 }
 
 std::vector<Volume> ReadVolumes(bool all)
@@ -124,10 +121,9 @@ std::optional<ExtFileSystem> ReadExtFileSystem(const std::string &device)
 {
     constexpr off_t place = 1024;
     std::array<unsigned char, 1024> block = {};
-    const int fd = ::open(device.c_str(), O_RDONLY | O_CLOEXEC);
-    const bool read = fd >= 0 && ::pread(fd, block.data(), block.size(), place) == static_cast<ssize_t>(block.size());
-    if (fd >= 0)
-        ::close(fd);
+    const Descriptor file(::open(device.c_str(), O_RDONLY | O_CLOEXEC));
+    const bool read =
+        file.IsOpen() && ::pread(file.Get(), block.data(), block.size(), place) == static_cast<ssize_t>(block.size());
     const auto number = [&](std::size_t at, int bytes) {
         uint64_t value = 0;
         for (int i = bytes; i-- > 0;)
