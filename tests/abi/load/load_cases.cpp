@@ -68,32 +68,21 @@ std::string CopyTo(const test::ScratchDir &folder, const std::string &extras = {
     return folder / "libtavosdk.so.1";
 }
 
-TEST(Load, AgainAfterClosing)
+TEST(Load, AgainAfterClosingAndInNamespaces)
 {
-    EXPECT_EQ(test::InChild([] {
-                  for (int round = 0; round < 3; ++round) {
-                      void *library = Open(TEST_LIBRARY);
-                      if (!Works(library) || ::dlclose(library) != 0)
-                          return 1;
-                  }
-                  return 0;
-              }),
-              0);
-}
-
-TEST(Load, TwiceInTwoNamespaces)
-{
-    EXPECT_EQ(test::InChild([] {
-                  for (int round = 0; round < 2; ++round) {
-                      for (int twice = 0; twice < 2; ++twice) {
-                          void *library = ::dlmopen(LM_ID_NEWLM, TEST_LIBRARY, RTLD_NOW);
+    for (const bool in_namespace : {false, true}) {
+        EXPECT_EQ(test::InChild([&] {
+                      for (int round = 0; round < 4; ++round) {
+                          void *library =
+                              in_namespace ? ::dlmopen(LM_ID_NEWLM, TEST_LIBRARY, RTLD_NOW) : Open(TEST_LIBRARY);
                           if (!Works(library) || ::dlclose(library) != 0)
                               return 1;
                       }
-                  }
-                  return 0;
-              }),
-              0);
+                      return 0;
+                  }),
+                  0)
+            << in_namespace;
+    }
 }
 
 TEST(Load, FindsItsExtrasFromAnyDirectoryByAnyName)
@@ -158,24 +147,21 @@ void RefusesAll(void *library, const test::ScratchDir &folder, const char *why)
     EXPECT_EQ(told, 1) << testing::PrintToString(log.Texts());
 }
 
-TEST(Load, WithoutItsExtras)
+TEST(Load, WithoutItsExtrasOrWithThoseOfAnotherVersion)
 {
-    EXPECT_EQ(test::InChild([] {
-                  const test::ScratchDir folder;
-                  RefusesAll(Open(CopyTo(folder)), folder, "No such file");
-                  return testing::Test::HasFailure() ? 1 : 0;
-              }),
-              0);
-}
-
-TEST(Load, WithExtrasOfAnotherVersion)
-{
-    EXPECT_EQ(test::InChild([] {
-                  const test::ScratchDir folder;
-                  RefusesAll(Open(CopyTo(folder, TEST_OTHER_EXTRAS)), folder, "another version");
-                  return testing::Test::HasFailure() ? 1 : 0;
-              }),
-              0);
+    const struct {
+        const char *extras;
+        const char *why;
+    } rows[] = {{"", "No such file"}, {TEST_OTHER_EXTRAS, "another version"}};
+    for (const auto &row : rows) {
+        EXPECT_EQ(test::InChild([&] {
+                      const test::ScratchDir folder;
+                      RefusesAll(Open(CopyTo(folder, row.extras)), folder, row.why);
+                      return testing::Test::HasFailure() ? 1 : 0;
+                  }),
+                  0)
+            << row.why;
+    }
 }
 
 // Memory can run out inside the library, which throws there and catches, and in the loading.

@@ -262,15 +262,17 @@ class Pair {
         }
     }
 
-    // Adds a string of the list itself again, also one that was removed from it.
+    // Adds a string of the list itself again, or its end, also of one that was removed from it.
     void PutsOwnString()
     {
         if (model_.Count() == 0)
             return;
         const int from = Any(model_.Count());
         const bool take_out = Any(2);
-        const std::string text = model_.items[static_cast<size_t>(from)].text;
-        const char *own = take_out ? SzTLIBSzListRemove(list_.get(), from) : list_->pszItem[from];
+        const std::string &whole = model_.items[static_cast<size_t>(from)].text;
+        const size_t skipped = static_cast<size_t>(Any(3) ? 0 : Any(static_cast<int>(whole.size()) + 1));
+        const std::string text = whole.substr(skipped);
+        const char *own = (take_out ? SzTLIBSzListRemove(list_.get(), from) : list_->pszItem[from]) + skipped;
         if (take_out)
             model_.items.erase(model_.items.begin() + from);
         const int to = Any(model_.Count() + 2);
