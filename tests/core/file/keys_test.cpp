@@ -2,31 +2,22 @@
 #include "tavo_file.h"
 
 #include "support/captured_log.h"
+#include "support/owned_container.h"
 #include "support/fault_state.h"
 #include "support/scratch_dir.h"
-#include "support/string_hash.h"
 
 #include <gmock/gmock.h>
 
-#include <memory>
-
 using test::Fault;
+using test::HashOf;
 using test::LastFault;
+using test::ListOf;
+using test::Owned;
+using test::PairMap;
 using test::Pairs;
-using test::StringHash;
 using testing::ElementsAre;
 
 namespace {
-
-using ListPointer = std::unique_ptr<TLIBSZLIST, decltype(&TLIBSzListFree)>;
-
-ListPointer ListOf(std::initializer_list<const char *> items)
-{
-    TLIBSZLIST *list = PslTLIBSzListAlloc(512);
-    for (const char *item : items)
-        TLIBSzListPush(&list, item);
-    return {list, TLIBSzListFree};
-}
 
 class KeysTest : public testing::Test {
   protected:
@@ -42,64 +33,63 @@ constexpr const char *kText = "a=1\n#a=0\nb = \"two words\"\nno sign\nempty=\na=
 TEST_F(KeysTest, WithoutWantedKeysTheLastLineCounts)
 {
     test::WriteFile(file_, kText);
-    StringHash hash(Pairs{{"kept", "yes"}});
-    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), nullptr, hash.Addr(), "="), 5);
-    EXPECT_EQ(hash.All(), (Pairs{{"kept", "yes"}, {"a", "3"}, {"b", "two words"}, {"c", "4"}, {"d", "5"}}));
-    StringHash same;
-    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), ListOf({}).get(), same.Addr(), "="), 4);
+    Owned<TLIBSZHASH> hash = HashOf({{"kept", "yes"}});
+    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), nullptr, hash, "="), 5);
+    EXPECT_EQ(Pairs(hash), (PairMap{{"kept", "yes"}, {"a", "3"}, {"b", "two words"}, {"c", "4"}, {"d", "5"}}));
+    Owned<TLIBSZHASH> same = HashOf({});
+    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), ListOf({}), same, "="), 4);
 }
 
 TEST_F(KeysTest, OfWantedKeysTheFirstLineCounts)
 {
     test::WriteFile(file_, kText);
-    StringHash hash;
-    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), ListOf({"d", "a", "a", "absent", "empty"}).get(), hash.Addr(), "="), 2);
-    EXPECT_EQ(hash.All(), (Pairs{{"a", "1"}, {"d", "5"}}));
+    Owned<TLIBSZHASH> hash = HashOf({});
+    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), ListOf({"d", "a", "a", "absent", "empty"}), hash, "="), 2);
+    EXPECT_EQ(Pairs(hash), (PairMap{{"a", "1"}, {"d", "5"}}));
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
 }
 
 TEST_F(KeysTest, SplitsAtOtherSeparators)
 {
     test::WriteFile(file_, "nameserver 10.0.0.1\nnameserver\t10.0.0.2\nsearch  a.example b.example\n");
-    StringHash hash;
-    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), nullptr, hash.Addr(), " \t"), 2);
-    EXPECT_EQ(hash.All(), (Pairs{{"nameserver", "10.0.0.2"}, {"search", "a.example b.example"}}));
+    Owned<TLIBSZHASH> hash = HashOf({});
+    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), nullptr, hash, " \t"), 2);
+    EXPECT_EQ(Pairs(hash), (PairMap{{"nameserver", "10.0.0.2"}, {"search", "a.example b.example"}}));
 }
 
 TEST_F(KeysTest, GetRefuses)
 {
-    StringHash hash;
+    Owned<TLIBSZHASH> hash = HashOf({});
     TLIBSZHASH *none = nullptr;
     test::WriteFile(file_, kText);
     for (const int result :
-         {TLIBFileGetKeys(nullptr, nullptr, hash.Addr(), "="), TLIBFileGetKeys(file_.c_str(), nullptr, nullptr, "="),
-          TLIBFileGetKeys(file_.c_str(), nullptr, &none, "="),
-          TLIBFileGetKeys(file_.c_str(), nullptr, hash.Addr(), nullptr)})
+         {TLIBFileGetKeys(nullptr, nullptr, hash, "="), TLIBFileGetKeys(file_.c_str(), nullptr, nullptr, "="),
+          TLIBFileGetKeys(file_.c_str(), nullptr, &none, "="), TLIBFileGetKeys(file_.c_str(), nullptr, hash, nullptr)})
         EXPECT_EQ(result, -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_get_keys"}));
-    EXPECT_EQ(TLIBFileGetKeys((dir_ / "missing").c_str(), nullptr, hash.Addr(), "="), -1);
+    EXPECT_EQ(TLIBFileGetKeys((dir_ / "missing").c_str(), nullptr, hash, "="), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "file_get_keys"}));
-    EXPECT_EQ(hash.All(), Pairs{});
+    EXPECT_EQ(Pairs(hash), PairMap{});
 }
 
 TEST_F(KeysTest, SetsEveryPairInOneRewrite)
 {
     test::WriteFile(file_, "# head\nb=1\na=1\nother=x\nb=2\nlast=1");
-    const Pairs pairs{{"a", "A"}, {"b", "B"}, {"new", "N"}};
-    StringHash hash(pairs);
-    EXPECT_EQ(TLIBFileSetKeys(file_.c_str(), hash.Get(), nullptr), 1);
+    const PairMap pairs{{"a", "A"}, {"b", "B"}, {"new", "N"}};
+    Owned<TLIBSZHASH> hash = HashOf(pairs);
+    EXPECT_EQ(TLIBFileSetKeys(file_.c_str(), hash, nullptr), 1);
     EXPECT_EQ(test::ReadFile(file_), "# head\nb=B\na=A\nother=x\nlast=1\nnew=N\n");
-    EXPECT_EQ(hash.All(), pairs) << "the caller's hash is not used up";
-    EXPECT_EQ(TLIBFileSetKeys((dir_ / "made").c_str(), hash.Get(), "%s: %s\n"), 1);
-    StringHash read;
-    EXPECT_EQ(TLIBFileGetKeys((dir_ / "made").c_str(), nullptr, read.Addr(), ":"), 3);
-    EXPECT_EQ(read.All(), pairs);
+    EXPECT_EQ(Pairs(hash), pairs) << "the caller's hash is not used up";
+    EXPECT_EQ(TLIBFileSetKeys((dir_ / "made").c_str(), hash, "%s: %s\n"), 1);
+    Owned<TLIBSZHASH> read = HashOf({});
+    EXPECT_EQ(TLIBFileGetKeys((dir_ / "made").c_str(), nullptr, read, ":"), 3);
+    EXPECT_EQ(Pairs(read), pairs);
     EXPECT_THAT(dir_.Names(), ElementsAre("made", "settings.conf"));
 }
 
 TEST_F(KeysTest, SetsManyKeysOfAnyOrder)
 {
-    Pairs pairs;
+    PairMap pairs;
     std::string text, expected;
     for (int i = 0; i < 300; ++i) {
         const std::string key = "key" + std::to_string(i);
@@ -108,15 +98,15 @@ TEST_F(KeysTest, SetsManyKeysOfAnyOrder)
         expected += key + "=" + pairs[key] + "\n";
     }
     test::WriteFile(file_, text);
-    StringHash hash(pairs);
-    EXPECT_EQ(TLIBFileSetKeys(file_.c_str(), hash.Get(), nullptr), 1);
+    Owned<TLIBSZHASH> hash = HashOf(pairs);
+    EXPECT_EQ(TLIBFileSetKeys(file_.c_str(), hash, nullptr), 1);
     EXPECT_EQ(test::ReadFile(file_), expected);
 }
 
 TEST_F(KeysTest, SetRefusesAndLogsTheLine)
 {
     struct Row {
-        Pairs pairs;
+        PairMap pairs;
         const char *format;
         const char *logged;
     };
@@ -128,8 +118,8 @@ TEST_F(KeysTest, SetRefusesAndLogsTheLine)
     test::WriteFile(file_, "a=0\n");
     for (const Row &row : rows) {
         log_.Clear();
-        StringHash hash(row.pairs);
-        EXPECT_EQ(TLIBFileSetKeys(file_.c_str(), hash.Get(), row.format), -1);
+        Owned<TLIBSZHASH> hash = HashOf(row.pairs);
+        EXPECT_EQ(TLIBFileSetKeys(file_.c_str(), hash, row.format), -1);
         EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_set_keys"}));
         ASSERT_EQ(log_.Texts().size(), 1u);
         EXPECT_THAT(log_.Texts()[0], testing::MatchesRegex("file_set_keys:[0-9]+ .*"));

@@ -51,10 +51,6 @@ TEST_F(LinesTest, ReadersRefuse)
 {
     test::WriteFile(file_, "first\nkey=1\n");
     char line[6] = "?";
-    struct Row {
-        int result, expected;
-        Fault fault;
-    };
     const auto check = [](int result, int expected, const Fault &fault) {
         EXPECT_EQ(result, expected);
         EXPECT_EQ(LastFault(), fault);
@@ -74,11 +70,6 @@ TEST_F(LinesTest, ReadersRefuse)
 
 TEST_F(LinesTest, EditsALine)
 {
-    struct Row {
-        int result;
-        const char *after;  // NULL: untouched
-        int code;
-    };
     constexpr const char *before = "one\nkey=1\nkey=2\nend";
     const auto check = [&](auto &&edit, int result, const char *after, int code = 0) {
         test::WriteFile(file_, before);

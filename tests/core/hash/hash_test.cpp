@@ -2,6 +2,7 @@
 #include "tavo_hash.h"
 
 #include "support/container_text.h"
+#include "support/owned_container.h"
 #include "support/fault_state.h"
 
 #include <gmock/gmock.h>
@@ -11,10 +12,11 @@
 using test::Fault;
 using test::Hash;
 using test::LastFault;
+using test::MakeHash;
 using test::Moving;
+using test::PairMap;
 using test::Pairs;
 using testing::ElementsAre;
-using PairMap = std::map<std::string, std::string>;
 
 namespace {
 
@@ -29,14 +31,6 @@ PairMap Numbered(int count)
     for (int i = 0; i < count; ++i)
         pairs["key number " + std::to_string(i)] = std::to_string(i * i);
     return pairs;
-}
-
-Hash MakeHash(const PairMap &pairs)
-{
-    Hash hash(PshTLIBSzHashAlloc(512));
-    for (const auto &[key, value] : pairs)
-        EXPECT_GE(SetValue(hash, key, value), 0) << key;
-    return hash;
 }
 
 TEST(HashCode, SumsLittleEndianWords)

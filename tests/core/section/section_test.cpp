@@ -1,9 +1,9 @@
 // Files with sections: headers, reading, rewriting, appending.
 #include "tavo_section.h"
 
+#include "support/owned_container.h"
 #include "support/fault_state.h"
 #include "support/scratch_dir.h"
-#include "support/string_hash.h"
 
 #include <gmock/gmock.h>
 
@@ -12,9 +12,12 @@
 #include <sys/stat.h>
 
 using test::Fault;
+using test::HashOf;
 using test::LastFault;
+using test::Owned;
+using test::PairMap;
 using test::Pairs;
-using test::StringHash;
+using test::Settings;
 using testing::ElementsAre;
 
 namespace {
@@ -59,18 +62,18 @@ TEST_F(SectionTest, ReadsTheFirstSectionOfAName)
 {
     test::WriteFile(file_, "top=0\n[net]x\n[other]\na=9\n[net] \n a = \"1 2\" \nb=1\nb=2\n#c=3\nno sign\n=d\nempty=\n"
                            "e=x=y\n[broken\nlost=1\n[net]\na=second\n");
-    StringHash hash(Pairs{{"kept", "yes"}});
-    EXPECT_EQ(TLIBFileGetSection(path_, "net", hash.Addr()), 5);
-    EXPECT_EQ(hash.All(), (Pairs{{"kept", "yes"}, {"a", "1 2"}, {"b", "2"}, {"empty", ""}, {"e", "x=y"}}));
-    StringHash none;
-    EXPECT_EQ(TLIBFileGetSection(path_, "absent", none.Addr()), 0);
+    Owned<TLIBSZHASH> hash = HashOf({{"kept", "yes"}});
+    EXPECT_EQ(TLIBFileGetSection(path_, "net", hash), 5);
+    EXPECT_EQ(Pairs(hash), (PairMap{{"kept", "yes"}, {"a", "1 2"}, {"b", "2"}, {"empty", ""}, {"e", "x=y"}}));
+    Owned<TLIBSZHASH> none = HashOf({});
+    EXPECT_EQ(TLIBFileGetSection(path_, "absent", none), 0);
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
 
     TLIBSZHASH *nothing = nullptr;
     EXPECT_EQ(TLIBFileGetSection(path_, "net", &nothing), -1);
-    EXPECT_EQ(TLIBFileGetSection(path_, nullptr, none.Addr()), -1);
+    EXPECT_EQ(TLIBFileGetSection(path_, nullptr, none), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_get_section", 54}));
-    EXPECT_EQ(TLIBFileGetSection((dir_ / "missing").c_str(), "net", none.Addr()), -1);
+    EXPECT_EQ(TLIBFileGetSection((dir_ / "missing").c_str(), "net", none), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "file_get_section", 62}));
 }
 
@@ -99,16 +102,15 @@ constexpr const char *kText = "top=0\n[net]\nold=1\n# stays\n[broken\nlost=1\n[o
 TEST_F(SectionTest, SetReplacesEverySectionOfTheName)
 {
     test::WriteFile(file_, kText, 0640);
-    const StringHash hash(Pairs{{"a", "1"}, {"b", "two words"}, {"c", ""}});
-    EXPECT_EQ(ErrTLIBFileSetSection(path_, "net", nullptr, hash.Get(), 1, nullptr), 1);
+    const Owned<TLIBSZHASH> hash = HashOf({{"a", "1"}, {"b", "two words"}, {"c", ""}});
+    EXPECT_EQ(ErrTLIBFileSetSection(path_, "net", nullptr, hash, 1, nullptr), 1);
     EXPECT_EQ(test::ReadFile(file_),
-              "top=0\n[net]\n" + hash.Text() + "# stays\n[other]\no=1\n[net]\n" + hash.Text() + ";too\n");
+              "top=0\n[net]\n" + Settings(hash) + "# stays\n[other]\no=1\n[net]\n" + Settings(hash) + ";too\n");
     struct stat st;
     ASSERT_EQ(::stat(path_, &st), 0);
     EXPECT_EQ(st.st_mode & 07777, 0640u);
 
-    EXPECT_EQ(
-        ErrTLIBFileSetSection(path_, "other", "renamed", StringHash(Pairs{{"x", "y"}}).Get(), 1, "%s = \"%s\"%%\n"), 1);
+    EXPECT_EQ(ErrTLIBFileSetSection(path_, "other", "renamed", HashOf({{"x", "y"}}), 1, "%s = \"%s\"%%\n"), 1);
     EXPECT_THAT(test::ReadFile(file_), testing::HasSubstr("# stays\n[renamed]\nx = \"y\"%\n[net]\n"));
     EXPECT_THAT(dir_.Names(), ElementsAre("file"));
 }
@@ -120,14 +122,14 @@ TEST_F(SectionTest, RemoveLeavesTheComments)
     EXPECT_EQ(ErrTLIBFileRemoveSection(path_, "net"), 1);
     EXPECT_EQ(test::ReadFile(file_), after);
     test::WriteFile(file_, kText);
-    EXPECT_EQ(ErrTLIBFileSetSection(path_, "net", nullptr, StringHash(Pairs{{"a", "1"}}).Get(), 0, nullptr), 1);
+    EXPECT_EQ(ErrTLIBFileSetSection(path_, "net", nullptr, HashOf({{"a", "1"}}), 0, nullptr), 1);
     EXPECT_EQ(test::ReadFile(file_), after) << "without the flag Set only removes";
 }
 
 TEST_F(SectionTest, AnAbsentSectionIsNotAdded)
 {
     test::WriteFile(file_, kText);
-    EXPECT_EQ(ErrTLIBFileSetSection(path_, "absent", nullptr, StringHash(Pairs{{"a", "1"}}).Get(), 1, nullptr), 0);
+    EXPECT_EQ(ErrTLIBFileSetSection(path_, "absent", nullptr, HashOf({{"a", "1"}}), 1, nullptr), 0);
     EXPECT_EQ(LastFault(), (Fault{ERR_KEY_NOT_FOUND, "file_modify_section"}));
     EXPECT_EQ(ErrTLIBFileRemoveSection(path_, "Net"), 0);
     EXPECT_EQ(test::ReadFile(file_), kText);
@@ -136,10 +138,10 @@ TEST_F(SectionTest, AnAbsentSectionIsNotAdded)
 TEST_F(SectionTest, SetRefuses)
 {
     test::WriteFile(file_, kText);
-    const StringHash hash(Pairs{{"a", "1"}});
+    const Owned<TLIBSZHASH> hash = HashOf({{"a", "1"}});
     struct Row {
         const char *new_name;
-        Pairs pairs;
+        PairMap pairs;
         const char *format;
         Fault fault;
     };
@@ -151,12 +153,12 @@ TEST_F(SectionTest, SetRefuses)
         {"new\n", {{"a", "1"}}, nullptr, {ERR_BAD_PARAMETERS, "file_hash_2_file"}},
     };
     for (const Row &row : rows) {
-        EXPECT_EQ(ErrTLIBFileSetSection(path_, "net", row.new_name, StringHash(row.pairs).Get(), 1, row.format), -1);
+        EXPECT_EQ(ErrTLIBFileSetSection(path_, "net", row.new_name, HashOf(row.pairs), 1, row.format), -1);
         EXPECT_EQ(LastFault(), row.fault);
     }
     EXPECT_EQ(ErrTLIBFileSetSection(path_, "net", nullptr, nullptr, 1, nullptr), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_set_section", 42}));
-    EXPECT_EQ(ErrTLIBFileSetSection(path_, nullptr, nullptr, hash.Get(), 1, nullptr), -1);
+    EXPECT_EQ(ErrTLIBFileSetSection(path_, nullptr, nullptr, hash, 1, nullptr), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_modify_section"}));
     EXPECT_EQ(TLIBIFileModifySection(path_, "net", nullptr, nullptr, 1, nullptr), -1);
     EXPECT_EQ(ErrTLIBFileRemoveSection((dir_ / "missing").c_str(), "net"), -1);
@@ -167,42 +169,42 @@ TEST_F(SectionTest, SetRefuses)
 
 TEST_F(SectionTest, AddAppends)
 {
-    const StringHash hash(Pairs{{"a", "1"}, {"b", "2"}});
-    EXPECT_EQ(ErrTLIBFileAddSection(path_, "net", hash.Get(), nullptr), 0);
+    const Owned<TLIBSZHASH> hash = HashOf({{"a", "1"}, {"b", "2"}});
+    EXPECT_EQ(ErrTLIBFileAddSection(path_, "net", hash, nullptr), 0);
     test::WriteFile(dir_ / "torn", "[a]\nx=1");
-    EXPECT_EQ(ErrTLIBFileAddSection((dir_ / "torn").c_str(), "a", hash.Get(), nullptr), 0);
-    EXPECT_EQ(test::ReadFile(file_), "[net]\n" + hash.Text());
-    EXPECT_EQ(test::ReadFile(dir_ / "torn"), "[a]\nx=1\n[a]\n" + hash.Text());
+    EXPECT_EQ(ErrTLIBFileAddSection((dir_ / "torn").c_str(), "a", hash, nullptr), 0);
+    EXPECT_EQ(test::ReadFile(file_), "[net]\n" + Settings(hash));
+    EXPECT_EQ(test::ReadFile(dir_ / "torn"), "[a]\nx=1\n[a]\n" + Settings(hash));
 
     for (const char *name : {"a]", "a\nb", "a\r"})
-        EXPECT_EQ(ErrTLIBFileAddSection(path_, name, hash.Get(), nullptr), -1);
+        EXPECT_EQ(ErrTLIBFileAddSection(path_, name, hash, nullptr), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_add_section"}));
     EXPECT_EQ(ErrTLIBFileAddSection(path_, "net", nullptr, nullptr), -1);
-    EXPECT_EQ(ErrTLIBFileAddSection(path_, "net", hash.Get(), "%s=%d\n"), -1);
+    EXPECT_EQ(ErrTLIBFileAddSection(path_, "net", hash, "%s=%d\n"), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_add_section"}));
-    EXPECT_EQ(ErrTLIBFileAddSection("/", "net", hash.Get(), nullptr), -1);
+    EXPECT_EQ(ErrTLIBFileAddSection("/", "net", hash, nullptr), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "file_add_section"}));
-    EXPECT_EQ(test::ReadFile(file_), "[net]\n" + hash.Text());
+    EXPECT_EQ(test::ReadFile(file_), "[net]\n" + Settings(hash));
 }
 
 TEST_F(SectionTest, WritesAHashToAStream)
 {
-    const StringHash hash(Pairs{{"a", "1"}, {"b", "2"}});
+    const Owned<TLIBSZHASH> hash = HashOf({{"a", "1"}, {"b", "2"}});
     FILE *stream = std::fopen(path_, "we");
-    EXPECT_EQ(ErrTLIBIFileHash2File(stream, nullptr, hash.Get(), nullptr), 0);
-    EXPECT_EQ(ErrTLIBIFileHash2File(stream, "n", StringHash().Get(), "%s = %s\n"), 0);
+    EXPECT_EQ(ErrTLIBIFileHash2File(stream, nullptr, hash, nullptr), 0);
+    EXPECT_EQ(ErrTLIBIFileHash2File(stream, "n", HashOf({}), "%s = %s\n"), 0);
     std::fclose(stream);
-    EXPECT_EQ(test::ReadFile(file_), hash.Text() + "[n]\n");
+    EXPECT_EQ(test::ReadFile(file_), Settings(hash) + "[n]\n");
 
     stream = std::fopen("/dev/full", "we");
     std::setvbuf(stream, nullptr, _IONBF, 0);
-    EXPECT_EQ(ErrTLIBIFileHash2File(stream, "n", hash.Get(), nullptr), -1);
+    EXPECT_EQ(ErrTLIBIFileHash2File(stream, "n", hash, nullptr), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, "file_hash_2_file", 60}));
-    EXPECT_EQ(ErrTLIBIFileHash2File(stream, nullptr, hash.Get(), nullptr), -1);
+    EXPECT_EQ(ErrTLIBIFileHash2File(stream, nullptr, hash, nullptr), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, "file_hash_2_file", 74}));
-    EXPECT_EQ(ErrTLIBIFileHash2File(stream, nullptr, hash.Get(), "=%s%s\n"), -1);
+    EXPECT_EQ(ErrTLIBIFileHash2File(stream, nullptr, hash, "=%s%s\n"), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_hash_2_file", 54}));
-    EXPECT_EQ(ErrTLIBIFileHash2File(nullptr, nullptr, hash.Get(), nullptr), -1);
+    EXPECT_EQ(ErrTLIBIFileHash2File(nullptr, nullptr, hash, nullptr), -1);
     std::fclose(stream);
 }
 

@@ -6,7 +6,6 @@
 
 #include <ctime>
 #include <filesystem>
-#include <utility>
 
 #include <fcntl.h>
 
@@ -17,46 +16,29 @@ constexpr const char *kStore = "/tmp/every_call/store.db";
 constexpr const char *kDevice = "/dev/vg1/volume_1";
 constexpr const char *kNoHash = "00000000000000000000000000000000";
 
-struct OneUser {
-    explicit OneUser(const char *name, int uid = -1)
-    {
-        TAVOUserAlloc(&user, name, "secret", uid, uid < 0 ? -1 : 100, "described", "", "", -1, 0, "", 0);
-    }
-    ~OneUser() { TAVOUserFree(user); }
-    OneUser(const OneUser &) = delete;
-    OneUser &operator=(const OneUser &) = delete;
-    operator TAVOUSER *() const { return user; }
-    operator const TAVOUSER * const *() const { return &user; }
-    TAVOUSER *Release() { return std::exchange(user, nullptr); }
-    void ShowIn(Trial &run) const { run.Show(user->nExpired); }
-    TAVOUSER *user = nullptr;
-};
+Made<TAVOUserFree> OneUser(const char *name, int uid = -1)
+{
+    Made<TAVOUserFree> user;
+    TAVOUserAlloc(user, name, "secret", uid, uid < 0 ? -1 : 100, "described", "", "", -1, 0, "", 0);
+    return Made<TAVOUserFree>{user.Release()};
+}
 
-struct OneGroup {
-    explicit OneGroup(const char *name, int gid = -1)
-    {
-        const char *const members[] = {"alice", "bob", nullptr};
-        TAVOGroupAlloc2(&group, name, gid, members);
-    }
-    ~OneGroup() { TAVOGroupFree(group); }
-    OneGroup(const OneGroup &) = delete;
-    OneGroup &operator=(const OneGroup &) = delete;
-    operator TAVOGROUP *() const { return group; }
-    TAVOGROUP *Release() { return std::exchange(group, nullptr); }
-    TAVOGROUP *group = nullptr;
-};
+Made<TAVOGroupFree> OneGroup(const char *name, int gid = -1)
+{
+    const char *const members[] = {"alice", "bob", nullptr};
+    Made<TAVOGroupFree> group;
+    TAVOGroupAlloc2(group, name, gid, members);
+    return Made<TAVOGroupFree>{group.Release()};
+}
 
 struct Accounts {
     Accounts()
     {
         const test::CapturedLog quiet;
         std::filesystem::create_directories("/tmp/every_call");
-        for (const char *name : {"alice", "bob"}) {
-            const OneUser one(name);
-            EXPECT_EQ(TAVOUserSetOne(nullptr, one.user), 0);
-        }
-        const OneGroup staff("staff");
-        EXPECT_EQ(TAVOGroupSet(nullptr, staff.group), 0);
+        for (const char *name : {"alice", "bob"})
+            EXPECT_EQ(TAVOUserSetOne(nullptr, OneUser(name)), 0);
+        EXPECT_EQ(TAVOGroupSet(nullptr, OneGroup("staff")), 0);
         EXPECT_EQ(TAVOGroupDescSet("staff", "old hands"), 0);
         TAVOBDB *store = TAVOBDbOpen(kStore, O_RDWR | O_CREAT, 1);
         EXPECT_EQ(TAVOBDbSet(store, "key", 3, "value", 5), 0);
@@ -68,42 +50,25 @@ struct Accounts {
 };
 
 // The store of a row, open.
-struct Store {
-    TAVOBDB *db = TAVOBDbOpen(kStore, O_RDWR, 1);
-
-    ~Store()
-    {
-        if (db)
-            TAVOBDbClose(db);
-    }
-    operator TAVOBDB *() const { return db; }
-    TAVOBDB *Release() { return std::exchange(db, nullptr); }
-};
+Made<TAVOBDbClose> Store(const char *path = kStore)
+{
+    return Made<TAVOBDbClose>{TAVOBDbOpen(path, O_RDWR, 1)};
+}
 
 struct UserStores {
-    TAVOUSERDB all = {TAVOBDbOpen(TAVO_USER_DB_NAME, O_RDWR, 1), TAVOBDbOpen(TAVO_USER_DB_MISC, O_RDWR, 1),
-                      TAVOBDbOpen(TAVO_USER_DB_SHADOW, O_RDWR, 1), TAVOBDbOpen(TAVO_USER_DB_SMB, O_RDWR, 1),
-                      TAVOBDbOpen(TAVO_USER_DB_UID, O_RDWR, 1)};
+    Made<TAVOBDbClose> name = Store(TAVO_USER_DB_NAME), misc = Store(TAVO_USER_DB_MISC),
+                       shadow = Store(TAVO_USER_DB_SHADOW), smb = Store(TAVO_USER_DB_SMB),
+                       uid = Store(TAVO_USER_DB_UID);
+    TAVOUSERDB all = {name, misc, shadow, smb, uid};
 
-    ~UserStores()
-    {
-        for (TAVOBDB *db : {all.pName, all.pMisc, all.pShadow, all.pSmb, all.pUid})
-            if (db)
-                TAVOBDbClose(db);
-    }
     operator TAVOUSERDB *() { return &all; }
 };
 
 struct GroupStores {
-    TAVOGROUPDB all = {TAVOBDbOpen(TAVO_GROUP_DB_NAME, O_RDWR, 1), TAVOBDbOpen(TAVO_GROUP_DB_ID, O_RDWR, 1),
-                       TAVOBDbOpen(TAVO_GROUP_DB_DESC, O_RDWR, 1)};
+    Made<TAVOBDbClose> name = Store(TAVO_GROUP_DB_NAME), gid = Store(TAVO_GROUP_DB_ID),
+                       desc = Store(TAVO_GROUP_DB_DESC);
+    TAVOGROUPDB all = {name, gid, desc};
 
-    ~GroupStores()
-    {
-        for (TAVOBDB *db : {all.pName, all.pGid, all.pDesc})
-            if (db)
-                TAVOBDbClose(db);
-    }
     operator TAVOGROUPDB *() { return &all; }
 };
 
@@ -151,7 +116,12 @@ Family AccountFamily()
             CALL(TAVOUserEnum, 0, ListOf({}), 1),
             CALL(TAVOUserEnumByPrefix, 0, ListOf({}), 1, "al"),
             CALL(TAVOUserEnumBySubstr, 0, ListOf({}), 1, "lic"),
-            CALL(TAVOUserExpiredDateFill, 0, OneUser("alice"), "2037/1/31"),
+            BODY(TAVOUserExpiredDateFill, 0,
+                 {
+                     const Made<TAVOUserFree> user = OneUser("alice");
+                     run(f, user.made, "2037/1/31");
+                     run.Show(user.made->nExpired);
+                 }),
             CALL(TAVOUserExpiredDateGet, 0, OneUser("alice"), Text<32>(), 32),
             CALL(TAVOUserFree, 0, OneUser("carol").Release()),
             CALL(TAVOUserGet, 0, "alice", Made<TAVOUserFree>()),

@@ -3,12 +3,12 @@
 #define TESTS_FAULT_EVERY_CALL_ARGUMENTS_H
 
 #include "call.h"
-#include "support/container_text.h"
+#include "support/owned_container.h"
 
-#include <map>
 #include <string>
 #include <string_view>
 #include <type_traits>
+#include <utility>
 #include <vector>
 
 namespace every_call {
@@ -58,13 +58,15 @@ T ParameterOf(void (*)(T));
 template <class T>
 T ParameterOf(int (*)(T));
 
-// A pointer that the call sets to something that kFree frees.
+// What kFree frees: made for the call, or by it.
 template <auto kFree, class T = decltype(ParameterOf(kFree))>
 struct Made {
-    T made = nullptr;
+    T made = {};
 
     ~Made() { kFree(made); }
+    operator T() const { return made; }
     operator T *() { return &made; }
+    T Release() { return std::exchange(made, T{}); }
 };
 
 // Words, which end with a null pointer.
@@ -74,32 +76,17 @@ struct Texts {
     operator const char * const *() const { return all; }
 };
 
-// A container, which the call may move.
-template <class T>
-struct Owned {
-    T *block;
-
-    explicit Owned(T *container) : block(container) {}
-    ~Owned() { test::FreeContainer()(block); }
-    Owned(const Owned &) = delete;
-    Owned &operator=(const Owned &) = delete;
-
-    operator T *() { return block; }
-    operator T **() { return &block; }
-    void ShowIn(Trial &run) const { run.Show(block); }
-};
+using test::Owned;
 
 inline Owned<TLIBSZLIST> ListOf(const std::vector<std::string> &items = {"b", "a", "c"}, int mode = 0)
 {
-    return Owned(test::MakeList(items, mode).release());
+    return test::ListOf(items, mode);
 }
 
-inline Owned<TLIBSZHASH> HashOf(const std::map<std::string, std::string> &pairs = {{"key", "value"}})
+// With little room left.
+inline Owned<TLIBSZHASH> HashOf(const test::PairMap &pairs = {{"key", "value"}})
 {
-    TLIBSZHASH *hash = PshTLIBSzHashAlloc(64);
-    for (const auto &[key, value] : pairs)
-        TLIBSzHashSetValue(&hash, key.c_str(), value.c_str());
-    return Owned(hash);
+    return Owned(test::MakeHash(pairs, 64));
 }
 
 }  // namespace every_call

@@ -92,6 +92,8 @@ class Trial {
     {
         if constexpr (requires { argument.ShowIn(*this); })
             argument.ShowIn(*this);
+        else if constexpr (requires { Show(argument.block); })
+            Show(argument.block);  // a container
     }
 
     template <class Result>

@@ -14,6 +14,7 @@ namespace {
 
 constexpr const char *kLines = "/tmp/every_call/lines.conf";
 constexpr const char *kSections = "/tmp/every_call/sections.conf";
+constexpr const char *kNew = "/tmp/every_call/new.conf";
 constexpr const char *kOther = "/tmp/every_call/other";
 constexpr const char *kMarked = "/tmp/every_call/marked.conf";
 constexpr const char *kPidFile = "/tmp/every_call/own.pid";
@@ -191,6 +192,12 @@ Family CoreFamily()
             CALL(TLIBFileTouch, 0, kOther),
             CALL(TLIBFileUTF8BomStrip, 0, kMarked),
             CALL(TLIBILineKeyMatch, 0, "key=value", "key"),
+
+            // The file is made.
+            CALL(TLIBFileAppendKey, 0, kNew, "added", "1", nullptr),
+            CALL(TLIBFileSetKeyValue, 0, kNew, "key", "new", nullptr),
+            CALL(TLIBFileSetKeys, 0, kNew, HashOf(), nullptr),
+            CALL(ErrTLIBFileAddSection, 0, kNew, "three", HashOf(), nullptr),
 
             // Sections.
             CALL(ErrTLIBFileAddSection, 0, kSections, "three", HashOf(), nullptr),

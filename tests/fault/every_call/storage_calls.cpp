@@ -137,28 +137,18 @@ struct Mirror {
     operator TLIBSZLIST *() { return paths; }
 };
 
-struct OpenDevice {
-    explicit OpenDevice(const char *path) : fd(::open(path, O_RDONLY | O_CLOEXEC)) {}
-    ~OpenDevice() { ::close(fd); }
-    OpenDevice(const OpenDevice &) = delete;
-    OpenDevice &operator=(const OpenDevice &) = delete;
-    operator int() const { return fd; }
-    int fd;
-};
+Made<::close> OpenDevice(const char *path)
+{
+    return Made<::close>{::open(path, O_RDONLY | O_CLOEXEC)};
+}
 
-struct VgInfo {
+Made<LVMVgInfoFree> VgInfo(const char *pv = nullptr)
+{
     LVMVGINFO *info = LVMVgInfoAlloc();
-
-    explicit VgInfo(const char *pv = nullptr)
-    {
-        if (pv)
-            TLIBSzListPush(&info->pslPvs, pv);
-    }
-    ~VgInfo() { LVMVgInfoFree(info); }
-    VgInfo(const VgInfo &) = delete;
-    VgInfo &operator=(const VgInfo &) = delete;
-    operator LVMVGINFO *() { return info; }
-};
+    if (pv)
+        TLIBSzListPush(&info->pslPvs, pv);
+    return Made<LVMVgInfoFree>{info};
+}
 
 // What a function makes: its last argument receives it.
 template <class T, class Function, class... Args>
@@ -338,8 +328,8 @@ Family StorageFamily()
             CALL(LVMVgSBGet, kAnswers, "/dev/vg1", Var<LVMVG>()),
             BODY(LVMVgSBListSearch, 0,
                  {
-                     VgInfo info;
-                     std::strcpy(info.info->szVg, "/dev/vg1");
+                     const Made<LVMVgInfoFree> info = VgInfo();
+                     std::strcpy(info.made->szVg, "/dev/vg1");
                      const LVMVGLIST node = {info, nullptr};
                      run(f, &node, Var<LVMVGKEY>{{"/dev/vg1", nullptr}}, Var<LVMVGINFO *>());
                  }),
