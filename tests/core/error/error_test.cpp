@@ -10,10 +10,6 @@
 #include <cerrno>
 #include <string>
 
-#include <fcntl.h>
-#include <sys/stat.h>
-#include <unistd.h>
-
 using test::Fault;
 using test::LastFault;
 
@@ -141,47 +137,6 @@ TEST(ErrorLogSet, Refuses)
     TLIBErrLogInitial(nullptr);
     TLIBErrLogInitial(dir.Path().c_str());
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
-}
-
-// In a directory that everybody may write to, another user's link or FIFO must not trap root. Elsewhere a link is the
-// administrator's own.
-TEST(ErrorLog, TrapsInPublicDirectories)
-{
-    const test::ScratchDir dir;
-    const std::string target = dir / "target";
-    const std::string open_dir = dir / "open";
-    const std::string private_dir = dir / "private";
-    ASSERT_EQ(::mkdir(open_dir.c_str(), 0777), 0);
-    ASSERT_EQ(::chmod(open_dir.c_str(), 01777), 0);
-    ASSERT_EQ(::mkdir(private_dir.c_str(), 0755), 0);
-    test::WriteFile(target, "mine\n");
-    for (const std::string &where : {open_dir, private_dir})
-        ASSERT_EQ(::symlink(target.c_str(), (where + "/link").c_str()), 0);
-    ASSERT_EQ(::mkfifo((open_dir + "/fifo").c_str(), 0666), 0);
-
-    EXPECT_EQ(TLIBErrLogSet((open_dir + "/link").c_str(), "x"), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "error_log_set", 38}));
-    EXPECT_EQ(TLIBErrLogSet((open_dir + "/fifo").c_str(), "x"), -1);
-    TLIBErrLogInitial((open_dir + "/link").c_str());
-    TLIBErrLogInitial((open_dir + "/fifo").c_str());
-    EXPECT_EQ(test::ReadFile(target), "mine\n");
-
-    EXPECT_EQ(TLIBErrLogSet((private_dir + "/link").c_str(), "x"), 0);
-    EXPECT_EQ(test::ReadFile(target), "mine\nx\n");
-
-    // A hard link is a second name of one of our files, for instance of a settings file on the same disk.
-    const std::string hard = open_dir + "/hard", theirs = open_dir + "/theirs";
-    ASSERT_EQ(::link(target.c_str(), hard.c_str()), 0);
-    test::WriteFile(theirs, "theirs\n");
-    ASSERT_EQ(::chown(theirs.c_str(), 1000, 0), 0);
-    for (const std::string &path : {hard, theirs}) {
-        test::ForgetFault();
-        EXPECT_EQ(TLIBErrLogSet(path.c_str(), "x"), -1) << path;
-        EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "error_log_set", 38}));
-        TLIBErrLogInitial(path.c_str());
-    }
-    EXPECT_EQ(test::ReadFile(target), "mine\nx\n");
-    EXPECT_EQ(test::ReadFile(theirs), "theirs\n");
 }
 
 }  // namespace

@@ -2,7 +2,6 @@
 #include "tavo_proc.h"
 
 #include "support/eventually.h"
-#include "support/failing_malloc.h"
 #include "support/fault_state.h"
 #include "support/own_child.h"
 #include "support/scratch_dir.h"
@@ -210,50 +209,6 @@ TEST(PidFile, Create)
         EXPECT_EQ(TAVOProcPidFileCreate(row.path), -1);
         EXPECT_EQ(LastFault(), row.fault);
     }
-}
-
-TEST(PidFile, CreateOutOfMemory)
-{
-    const test::ScratchDir dir;
-    const std::string path = dir / "a name that is longer than what a string keeps within itself.pid";
-    test::EachAllocation faults;
-    while (faults.Next()) {
-        faults.Arm();
-        const int result = TAVOProcPidFileCreate(path.c_str());
-        faults.Disarm();
-        EXPECT_EQ(result, faults.Fired() ? -1 : 0);
-        EXPECT_EQ(faults.LeftAllocated(), 0);
-        if (faults.Fired()) {
-            EXPECT_EQ(LastFault(), (Fault{ERR_OUT_OF_MEMORY, "proc_pid_file_create"}));
-        }
-    }
-    EXPECT_GE(faults.Count(), 1);
-}
-
-TEST(PidFile, CreateAmongTraps)
-{
-    const test::ScratchDir dir;
-    const std::string open_dir = dir / "open";
-    ASSERT_EQ(::mkdir(open_dir.c_str(), 0777), 0);
-    ASSERT_EQ(::chmod(open_dir.c_str(), 01777), 0);
-    const std::string victim = dir / "victim", link = open_dir + "/link", hard = open_dir + "/hard",
-                      fifo = open_dir + "/fifo", foreign = open_dir + "/foreign", mine = open_dir + "/mine";
-    test::WriteFile(victim, "kept");
-    test::WriteFile(foreign, "kept");
-    ASSERT_EQ(::chown(foreign.c_str(), kSomebody, 0), 0);
-    ASSERT_EQ(::symlink(victim.c_str(), link.c_str()), 0);
-    ASSERT_EQ(::link(victim.c_str(), hard.c_str()), 0);
-    ASSERT_EQ(::mkfifo(fifo.c_str(), 0666), 0);
-    for (const std::string &path : {link, hard, fifo, foreign}) {
-        test::ForgetFault();
-        EXPECT_EQ(TAVOProcPidFileCreate(path.c_str()), -1) << path;
-        EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "proc_pid_file_create"})) << path;
-    }
-    EXPECT_EQ(test::ReadFile(victim), "kept");
-    EXPECT_EQ(test::ReadFile(foreign), "kept");
-    for (int i = 0; i < 2; ++i)
-        EXPECT_EQ(TAVOProcPidFileCreate(mine.c_str()), 0);
-    EXPECT_EQ(test::ReadFile(mine), Number(::getpid()));
 }
 
 TEST(ProcAlive, AsksAboutOneProcess)

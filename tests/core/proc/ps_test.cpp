@@ -191,22 +191,11 @@ TEST_F(Ps, TrapsAtTheScratchFile)
     const std::string victim = dir_ / "victim";
     test::WriteFile(victim, "kept");
     const struct {
-        const char *what;
         std::function<int()> plant;
-    } rows[] = {
-        {"link",
-         [&] {
-             return ::symlink(victim.c_str(), scratch_.c_str());
-         }},
-        {"file",
-         [&] {
-             return test::WriteFile(scratch_, "1 sleep 271828\n"), 0;
-         }},
-        {"FIFO",
-         [&] {
-             return ::mkfifo(scratch_.c_str(), 0666);
-         }},
-    };
+        const char *what;
+    } rows[] = {{[&] { return ::symlink(victim.c_str(), scratch_.c_str()); }, "link"},
+                {[&] { return test::WriteFile(scratch_, "1 sleep 271828\n"), 0; }, "file"},
+                {[&] { return ::mkfifo(scratch_.c_str(), 0666); }, "FIFO"}};
     for (const auto &row : rows) {
         ASSERT_EQ(row.plant(), 0) << row.what;
         EXPECT_EQ(TLIBPs("sleep 271828", nullptr, 0), 5) << "our own stale " << row.what;

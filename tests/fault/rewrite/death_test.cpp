@@ -1,13 +1,11 @@
 // A process that dies in the middle of a rewrite: the file is the old one or the new one.
 #include "interposed_calls.h"
-#include "support/rounds.h"
 #include "support/scratch_dir.h"
 #include "writers.h"
 
 #include <gmock/gmock.h>
 
 #include <csignal>
-#include <random>
 
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -44,33 +42,38 @@ std::string TextAfter(const test::Writer &writer, const std::string &path)
     return test::ReadFile(path);
 }
 
+void DiesAtEveryCall(const test::Writer &writer, const std::string &parent)
+{
+    SCOPED_TRACE(writer.name + (" in " + parent));
+    const test::Place dir(parent);
+    const std::string file = dir / "file";
+    const std::string new_text = TextAfter(writer, file);
+    ASSERT_NE(new_text, kOldText);
+    int n = 0, seen_new = 0;
+    for (bool survived = false; !survived && n < 100;) {
+        test::WriteFile(file, kOldText, 0640);
+        ASSERT_EQ(::chown(file.c_str(), 0, 1), 0);
+        survived = Survives(writer, file, ++n);
+        const std::string text = test::ReadFile(file);
+        EXPECT_TRUE(text == new_text || (text == kOldText && !survived)) << "at call " << n;
+        seen_new += text == new_text;
+        struct stat st;
+        ASSERT_EQ(::stat(file.c_str(), &st), 0);
+        EXPECT_EQ(st.st_mode & 07777, 0640u) << "at call " << n;
+        EXPECT_EQ(st.st_gid, 1u) << "at call " << n;
+    }
+    EXPECT_EQ(n, 7) << "write, fchown, fchmod, fsync, rename, fsync of the directory, the end";
+    EXPECT_EQ(seen_new, 2) << "after the rename";
+    // The next rewrite removes the files of dead processes.
+    EXPECT_EQ(TextAfter(writer, file), new_text);
+    EXPECT_THAT(dir.Names(), testing::ElementsAre("file"));
+}
+
 TEST(Death, AtEveryCallOfARewriteLeavesTheOldOrTheNewFile)
 {
-    const test::ScratchDir dir;
-    const std::string file = dir / "file";
-    for (const test::Writer &writer : test::kRewriters) {
-        const std::string new_text = TextAfter(writer, file);
-        ASSERT_NE(new_text, kOldText) << writer.name;
-        int n = 0, seen_new = 0;
-        do {
-            test::WriteFile(file, kOldText, 0640);
-            ASSERT_EQ(::chown(file.c_str(), 0, 1), 0);
-            const bool survived = Survives(writer, file, ++n);
-            const std::string text = test::ReadFile(file);
-            EXPECT_TRUE(text == new_text || (text == kOldText && !survived)) << writer.name << " at call " << n;
-            seen_new += text == new_text;
-            struct stat st;
-            ASSERT_EQ(::stat(file.c_str(), &st), 0);
-            EXPECT_EQ(st.st_mode & 07777, 0640u) << writer.name << " at call " << n;
-            EXPECT_EQ(st.st_gid, 1u) << writer.name << " at call " << n;
-            if (survived)
-                break;
-        } while (n < 100);
-        EXPECT_EQ(n, 7) << writer.name << ": write, fchown, fchmod, fsync, rename, fsync of the directory, the end";
-        EXPECT_EQ(seen_new, 2) << writer.name << ": after the rename";
-        // The next rewrite removes the files of dead processes.
-        EXPECT_EQ(TextAfter(writer, file), new_text) << writer.name;
-        EXPECT_THAT(dir.Names(), testing::ElementsAre("file")) << writer.name;
+    for (const std::string &parent : test::Parents()) {
+        for (const test::Writer &writer : test::kRewriters)
+            DiesAtEveryCall(writer, parent);
     }
 }
 
@@ -131,54 +134,19 @@ TEST(Death, AtEveryCallOfAnAppendLeavesTheOldLines)
     }
 }
 
-TEST(Death, AtRandomMomentsLeavesOneOfTheTwoFiles)
-{
-    const test::ScratchDir dir;
-    const std::string file = dir / "file";
-    const std::string old_text = TextAfter(test::kRewriters[0], file);
-    std::string other_text = old_text;
-    other_text.replace(other_text.find("key=new"), 7, "key=" + std::string(300, 'x'));
-    std::mt19937 random(4711);  // the moments differ anyway
-    int seen_old = 0, seen_other = 0;
-    unsigned left = 0;
-    for (int kill = 0; kill < 2000 / test::Stride(); ++kill) {
-        const pid_t child = ::fork();
-        if (child == 0) {
-            for (const std::string value(300, 'x');;) {
-                TLIBFileSetKeyValue(file.c_str(), "key", value.c_str(), nullptr);
-                TLIBFileSetKeyValue(file.c_str(), "key", "new", nullptr);
-            }
-        }
-        ::usleep(useconds_t(std::uniform_int_distribution<int>(0, 2000 * test::Stride())(random)));
-        ::kill(child, SIGKILL);
-        StatusOf(child);
-        const std::string text = test::ReadFile(file);
-        ASSERT_TRUE(text == old_text || text == other_text) << "after kill " << kill << ": " << text.size() << " bytes";
-        (text == old_text ? seen_old : seen_other) += 1;
-        const size_t names = dir.Names().size();
-        ASSERT_LE(names, 2u) << "the dead pile up";
-        left += names == 2;
-    }
-    EXPECT_GT(seen_old, 0);
-    EXPECT_GT(seen_other, 0);
-    EXPECT_GT(left, 50u / unsigned(test::Stride())) << "too few were killed in the middle of it";
-    EXPECT_EQ(test::kRewriters[0].write(file.c_str()), 1);
-    EXPECT_THAT(dir.Names(), testing::ElementsAre("file"));
-}
-
 TEST(Syncs, OneFileAndOneDirectoryHoweverManyKeys)
 {
     const test::ScratchDir dir;
     const std::string file = dir / "file";
-    test::Pairs twenty;
+    test::PairMap twenty;
     for (int i = 0; i < 20; ++i)
         twenty["key" + std::to_string(i)] = "value";
-    const test::StringHash pairs(twenty);
+    const test::Hash pairs = test::MakeHash(twenty);
     test::WriteFile(file, kOldText);
     test::TakeSyncs();
     EXPECT_EQ(TLIBFileSetKeyValue(file.c_str(), "key", "new", nullptr), 1);
     const test::Syncs one = test::TakeSyncs();
-    EXPECT_EQ(TLIBFileSetKeys(file.c_str(), pairs.Get(), nullptr), 1);
+    EXPECT_EQ(TLIBFileSetKeys(file.c_str(), pairs.get(), nullptr), 1);
     const test::Syncs many = test::TakeSyncs();
     EXPECT_EQ(one.files, 1);
     EXPECT_EQ(one.directories, 1);

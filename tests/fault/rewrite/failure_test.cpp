@@ -40,20 +40,23 @@ TEST(FailingCalls, ReturnTheirCodes)
         {Call::fchmod, EPERM, ERR_WRITE_FAILED},  {Call::fchown, EPERM, ERR_WRITE_FAILED},
         {Call::rename, EBUSY, ERR_RENAME_FAILED},
     };
-    const test::ScratchDir dir;
-    const std::string file = dir / "file";
     const int descriptors = test::OpenDescriptors();
-    for (const Row &row : rows) {
-        for (const test::Writer &writer : test::kRewriters) {
-            test::WriteFile(file, kOldText);
-            ASSERT_EQ(::chown(file.c_str(), 0, 1), 0);
-            test::ForgetFault();
-            test::FailCalls(row.call, row.error);
-            EXPECT_EQ(writer.write(file.c_str()), -1) << writer.name;
-            test::FailCalls(Call::none, 0);
-            EXPECT_EQ(LastFault(), (Fault{row.code, writer.module})) << writer.name;
-            EXPECT_EQ(test::ReadFile(file), kOldText) << writer.name;
-            EXPECT_THAT(dir.Names(), ElementsAre("file")) << writer.name;
+    for (const std::string &parent : test::Parents()) {
+        const test::Place dir(parent);
+        const std::string file = dir / "file";
+        for (const Row &row : rows) {
+            for (const test::Writer &writer : test::kRewriters) {
+                SCOPED_TRACE(writer.name + (" in " + parent));
+                test::WriteFile(file, kOldText);
+                ASSERT_EQ(::chown(file.c_str(), 0, 1), 0);
+                test::ForgetFault();
+                test::FailCalls(row.call, row.error);
+                EXPECT_EQ(writer.write(file.c_str()), -1);
+                test::FailCalls(Call::none, 0);
+                EXPECT_EQ(LastFault(), (Fault{row.code, writer.module}));
+                EXPECT_EQ(test::ReadFile(file), kOldText);
+                EXPECT_THAT(dir.Names(), ElementsAre("file"));
+            }
         }
     }
     EXPECT_EQ(test::OpenDescriptors(), descriptors);
@@ -84,26 +87,22 @@ TEST(FailingCalls, OfAnAppendTakeItBack)
 
 TEST(FailingCalls, OfTheDirectoryAreOnlyLogged)
 {
-    const test::ScratchDir dir;
-    test::CapturedLog log;
-    for (const test::Writer &writer : test::kRewriters) {
-        const std::string file = dir / writer.name;
-        test::WriteFile(file, kOldText);
-        log.Clear();
+    const auto logs = [](const test::Writer &writer, const std::string &file) {
+        const test::CapturedLog log;
         test::FailCalls(Call::fsync_directory, EIO);
         EXPECT_EQ(writer.write(file.c_str()), 1) << writer.name << ": the file is the new one already";
         test::FailCalls(Call::none, 0);
         EXPECT_THAT(log.Texts(),
                     ElementsAre(testing::MatchesRegex(writer.module + std::string(":[0-9]+ Failed to sync.*"))));
-    }
-    for (const test::Writer &writer : test::kAppenders) {
-        const std::string made = dir / writer.name;
-        log.Clear();
-        test::FailCalls(Call::fsync_directory, EIO);
-        EXPECT_EQ(writer.write(made.c_str()), 1) << writer.name;
-        test::FailCalls(Call::none, 0);
-        EXPECT_THAT(log.Texts(),
-                    ElementsAre(testing::MatchesRegex(writer.module + std::string(":[0-9]+ Failed to sync.*"))));
+    };
+    for (const std::string &parent : test::Parents()) {
+        const test::Place dir(parent);
+        for (const test::Writer &writer : test::kRewriters) {
+            test::WriteFile(dir / writer.name, kOldText);
+            logs(writer, dir / writer.name);
+        }
+        for (const test::Writer &writer : test::kAppenders)
+            logs(writer, dir / writer.name);
     }
 }
 

@@ -59,11 +59,6 @@ void StopAtCall(int n)
     calls_made = 0;
 }
 
-int CallsMade()
-{
-    return calls_made;
-}
-
 void FailCalls(Call call, int error)
 {
     failing = call;

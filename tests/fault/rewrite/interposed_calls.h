@@ -13,9 +13,6 @@ void DieAtCall(int n);
 // Before the n-th of these calls from now on the process stops (SIGSTOP).
 void StopAtCall(int n);
 
-// How many of these calls there were since.
-int CallsMade();
-
 enum class Call { none, fstat, write, fsync_file, fsync_directory, fchmod, fchown, rename, flock };
 
 // From now on these calls fail with this errno.

@@ -1,4 +1,7 @@
 // Traps where a rewrite looks: links, FIFOs, devices, directories, other users' files.
+#include "tavo_error.h"
+#include "tavo_proc.h"
+
 #include "support/fault_state.h"
 #include "support/scratch_dir.h"
 #include "writers.h"
@@ -14,7 +17,7 @@ using testing::ElementsAre;
 
 namespace {
 
-constexpr const char *kScratch = "/etc/skel/tempErrTLIBFileComment";
+using test::kScratch;
 
 ino_t InodeOf(const std::string &path)
 {
@@ -88,31 +91,60 @@ TEST_F(Planted, TheScratchFileOfALivingProcessStays)
     EXPECT_NE(::access(kScratch, F_OK), 0) << "nothing is left where new homes are copied from";
 }
 
-// In /tmp a link may be another user's trap; anywhere else it is the administrator's own.
-TEST_F(Planted, LinksInAPublicDirectoryAreNotFollowed)
+// In /tmp a link, a second name of a file or a FIFO may be another user's trap; anywhere else a link is the administrator's
+// own.
+TEST_F(Planted, TrapsInAPublicDirectoryAreNotOpened)
 {
-    const std::string open_dir = dir_ / "open";
+    const std::string open_dir = dir_ / "open", link = dir_ / "link";
     ASSERT_EQ(::mkdir(open_dir.c_str(), 0755), 0);
     ASSERT_EQ(::chmod(open_dir.c_str(), 01777), 0);
-    const std::string trap = open_dir + "/trap", dangling = open_dir + "/dangling", link = dir_ / "link";
-    ASSERT_EQ(::symlink(victim_.c_str(), trap.c_str()), 0);
-    ASSERT_EQ(::symlink((dir_ / "nologin").c_str(), dangling.c_str()), 0);
-    ASSERT_EQ(::symlink(file_.c_str(), link.c_str()), 0);
     test::WriteFile(victim_, test::kOldText);
     test::WriteFile(file_, test::kOldText);
-    for (const std::string &path : {trap, dangling}) {
-        const auto refuses = [&](const test::Writer &writer) {
+    const auto in = [&](const char *name) {
+        return open_dir + "/" + name;
+    };
+    ASSERT_EQ(::symlink(victim_.c_str(), in("trap").c_str()), 0);
+    ASSERT_EQ(::symlink((dir_ / "nologin").c_str(), in("dangling").c_str()), 0);
+    ASSERT_EQ(::link(victim_.c_str(), in("hard").c_str()), 0);
+    ASSERT_EQ(::mkfifo(in("fifo").c_str(), 0666), 0);
+    test::WriteFile(in("theirs"), test::kOldText);
+    ASSERT_EQ(::chown(in("theirs").c_str(), 1000, 0), 0);
+    ASSERT_EQ(::symlink(file_.c_str(), link.c_str()), 0);
+    const struct {
+        int (*open)(const char *);
+        test::Fault fault;
+    } openers[] = {
+        {[](const char *path) { return TLIBErrLogSet(path, "x"); }, {ERR_OPEN_FAILED, "error_log_set", 38}},
+        {[](const char *path) { return TLIBErrLogInitial(path), -1; }, {}},
+        {TAVOProcPidFileCreate, {ERR_OPEN_FAILED, "proc_pid_file_create"}},
+    };
+    for (const char *name : {"trap", "dangling", "hard", "fifo", "theirs"}) {
+        const std::string path = in(name);
+        for (const auto &opener : openers) {
+            test::ForgetFault();
+            EXPECT_EQ(opener.open(path.c_str()), -1) << path;
+            EXPECT_EQ(test::LastFault(), opener.fault) << path;
+        }
+        for (const test::Writer &writer : test::kAppenders) {
             EXPECT_LE(writer.write(path.c_str()), 0) << writer.name << " " << path;
             EXPECT_EQ(test::LastFault(), (test::Fault{ERR_OPEN_FAILED, writer.module})) << path;
-        };
-        for (const test::Writer &writer : test::kRewriters)
-            refuses(writer);
-        for (const test::Writer &writer : test::kAppenders)
-            refuses(writer);
-        EXPECT_EQ(TLIBFileTouch(path.c_str()), -1) << path;
+        }
+    }
+    for (const char *name : {"trap", "dangling"}) {
+        for (const test::Writer &writer : test::kRewriters) {
+            EXPECT_LE(writer.write(in(name).c_str()), 0) << writer.name << " " << name;
+            EXPECT_EQ(test::LastFault(), (test::Fault{ERR_OPEN_FAILED, writer.module})) << name;
+        }
+        EXPECT_EQ(TLIBFileTouch(in(name).c_str()), -1) << name;
     }
     EXPECT_EQ(test::ReadFile(victim_), test::kOldText);
-    std::string text = test::kOldText;
+    EXPECT_EQ(test::ReadFile(in("theirs")), test::kOldText);
+    for (int i = 0; i < 2; ++i)
+        EXPECT_EQ(TAVOProcPidFileCreate(in("mine").c_str()), 0);
+    EXPECT_EQ(TLIBReadPidFile(in("mine").c_str()), ::getpid());
+
+    EXPECT_EQ(TLIBErrLogSet(link.c_str(), "x"), 0);
+    std::string text = test::kOldText + "x\n";
     for (const test::Writer &writer : test::kAppenders) {
         EXPECT_EQ(writer.write(link.c_str()), 1) << writer.name;
         EXPECT_TRUE(test::ReadFile(file_).starts_with(text)) << writer.name;
@@ -126,8 +158,8 @@ TEST_F(Planted, RefusesSpecialFilesAtOnce)
 {
     const std::string fifo = dir_ / "fifo";
     ASSERT_EQ(::mkfifo(fifo.c_str(), 0666), 0);
-    TLIBSZLIST *list = PslTLIBSzListAlloc(0);
-    test::StringHash hash;
+    test::Owned<TLIBSZLIST> list = test::ListOf({});
+    test::Owned<TLIBSZHASH> hash = test::HashOf({});
     for (const std::string &path : {fifo, dir_.Path(), std::string("/dev/zero"), std::string("/dev/full")}) {
         const char *at = path.c_str();
         const bool directory = path == dir_.Path();
@@ -141,13 +173,12 @@ TEST_F(Planted, RefusesSpecialFilesAtOnce)
             const int code = directory && key ? ERR_BAD_PARAMETERS : ERR_OPEN_FAILED;
             EXPECT_EQ(test::LastFault(), (test::Fault{code, writer.module})) << path;
         }
-        for (const int result : {TLIBFileGetKeyValue(at, "key", nullptr, 0, 0), TLIBFileMatchLineNo(at, "key"),
-                                 TLIBFileGetKeys(at, nullptr, hash.Addr(), "="), TLIBFileReadLines(at, &list),
-                                 TLIBFileGetSection(at, "net", hash.Addr()), TLIBFileEnumSection(at, &list),
-                                 TLIBFileGetLine(at, 1, nullptr, 0), TLIBFileTouch(at)})
+        for (const int result :
+             {TLIBFileGetKeyValue(at, "key", nullptr, 0, 0), TLIBFileMatchLineNo(at, "key"),
+              TLIBFileGetKeys(at, nullptr, hash, "="), TLIBFileReadLines(at, list), TLIBFileGetSection(at, "net", hash),
+              TLIBFileEnumSection(at, list), TLIBFileGetLine(at, 1, nullptr, 0), TLIBFileTouch(at)})
             EXPECT_EQ(result, -1) << path;
     }
-    TLIBSzListFree(list);
     EXPECT_THAT(dir_.Names(), ElementsAre("fifo", "file", "victim"));
 }
 

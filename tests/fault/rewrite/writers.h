@@ -5,9 +5,13 @@
 #include "tavo_file.h"
 #include "tavo_section.h"
 
-#include "support/string_hash.h"
+#include "support/appliance_root.h"
+#include "support/owned_container.h"
 
+#include <filesystem>
+#include <set>
 #include <string>
+#include <vector>
 
 namespace test {
 
@@ -19,10 +23,10 @@ struct Writer {
     int (*write)(const char *path);
 };
 
-inline const StringHash &NewPairs()
+inline const TLIBSZHASH *NewPairs()
 {
-    static const StringHash pairs(Pairs{{"key", "new"}, {"more", std::string(500, 'm')}});
-    return pairs;
+    static const Hash pairs = MakeHash({{"key", "new"}, {"more", std::string(500, 'm')}});
+    return pairs.get();
 }
 
 #define WRITER(name, module, call)                                                                                     \
@@ -36,15 +40,14 @@ inline const StringHash &NewPairs()
 inline constexpr Writer kRewriters[] = {
     WRITER("SetKeyValue", "file_set_key_value", TLIBFileSetKeyValue(path, "key", "new", nullptr)),
     WRITER("RemoveKey", "file_remove_key", TLIBFileRemoveKey(path, "key")),
-    WRITER("SetKeys", "file_set_keys", TLIBFileSetKeys(path, NewPairs().Get(), nullptr)),
+    WRITER("SetKeys", "file_set_keys", TLIBFileSetKeys(path, NewPairs(), nullptr)),
     WRITER("SetLine", "file_set_line", TLIBFileSetLine(path, 2, "key=x")),
     WRITER("SetLineByKey", "file_set_line_by_key", TLIBFileSetLineByKey(path, "key", "key=y")),
     WRITER("AddLine", "file_add_line", TLIBFileAddLine(path, 0, "end")),
     WRITER("AddLineByKey", "file_add_line_by_key", TLIBFileAddLineByKey(path, "key", "before")),
     WRITER("ReplaceSubStr", "file_replace_sub_str", TLIBFileReplaceSubStr(path, "old", "new")),
     WRITER("UTF8BomStrip", "file_utf8bom_strip", TLIBFileUTF8BomStrip(path)),
-    WRITER("SetSection", "file_modify_section",
-           ErrTLIBFileSetSection(path, "net", nullptr, NewPairs().Get(), 1, nullptr)),
+    WRITER("SetSection", "file_modify_section", ErrTLIBFileSetSection(path, "net", nullptr, NewPairs(), 1, nullptr)),
     WRITER("RemoveSection", "file_modify_section", ErrTLIBFileRemoveSection(path, "net")),
     WRITER("Comment", "file_comment", TLIBFileComment(path, "key")),
 };
@@ -52,10 +55,46 @@ inline constexpr Writer kRewriters[] = {
 // Each returns 1 when it is done.
 inline constexpr Writer kAppenders[] = {
     WRITER("AppendKey", "file_append_key", TLIBFileAppendKey(path, "added", "v", nullptr)),
-    WRITER("AddSection", "file_add_section", ErrTLIBFileAddSection(path, "added", NewPairs().Get(), nullptr) + 1),
+    WRITER("AddSection", "file_add_section", ErrTLIBFileAddSection(path, "added", NewPairs(), nullptr) + 1),
 };
 
 #undef WRITER
+
+// On the file system of /etc/skel, TLIBFileComment begins its new file there, under this name.
+inline constexpr const char *kScratch = "/etc/skel/tempErrTLIBFileComment";
+
+// A folder in which rewrites are tried.
+class Place {
+  public:
+    explicit Place(const std::string &parent) : path_(parent + "/rewritten")
+    {
+        std::filesystem::create_directories("/etc/skel");
+        std::filesystem::create_directory(path_);
+    }
+    ~Place() { std::filesystem::remove_all(path_); }
+    Place(const Place &) = delete;
+    Place &operator=(const Place &) = delete;
+
+    std::string operator/(const std::string &name) const { return path_ + "/" + name; }
+    std::set<std::string> Names() const
+    {
+        std::set<std::string> names;
+        for (const auto &entry : std::filesystem::directory_iterator(path_))
+            names.insert(entry.path().filename());
+        if (std::filesystem::exists(kScratch))
+            names.insert(kScratch);
+        return names;
+    }
+
+  private:
+    std::string path_;
+};
+
+// Anywhere, and in the appliance root on the file system of /etc/skel, too.
+inline std::vector<std::string> Parents()
+{
+    return RootForm().empty() ? std::vector<std::string>{"/tmp"} : std::vector<std::string>{"/tmp", "/etc"};
+}
 
 }  // namespace test
 
