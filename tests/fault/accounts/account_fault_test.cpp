@@ -85,8 +85,12 @@ int SetGroup(const char *old_name, const char *name)
     return TAVOGroupSet(old_name, &group);
 }
 
-int ShowUser(int result, TAVOUSER *user, Outcome &outcome)
+// Each takes a function and its arguments before the last one.
+template <class Function, class Key>
+int ShowUser(Outcome &outcome, Function get, Key key)
 {
+    TAVOUSER *user = nullptr;
+    const int result = get(key, &user);
     if (result == 0) {
         for (const char *text : {user->szName, user->szPasswd, user->szHome, user->szMail})
             outcome.Say(text);
@@ -97,8 +101,11 @@ int ShowUser(int result, TAVOUSER *user, Outcome &outcome)
     return result;
 }
 
-int ShowGroup(int result, TAVOGROUP *group, Outcome &outcome)
+template <class Function, class Key>
+int ShowGroup(Outcome &outcome, Function get, Key key)
 {
+    TAVOGROUP *group = nullptr;
+    const int result = get(key, &group);
     if (result == 0) {
         outcome.Say(group->szName);
         for (char **member = group->rgszMember; *member; ++member)
@@ -108,8 +115,17 @@ int ShowGroup(int result, TAVOGROUP *group, Outcome &outcome)
     return result;
 }
 
+template <class Function, class Key>
+int ShowText(Outcome &outcome, Function get, Key key)
+{
+    char text[64] = "";
+    const int length = get(key, text, sizeof text);
+    outcome.Say(length < 0 ? "" : text);
+    return length < 0 ? -1 : 0;
+}
+
 template <class List>
-int Listed(Outcome &outcome, List list)
+int ShowList(Outcome &outcome, List list)
 {
     TLIBSZLIST *names = PslTLIBSzListAlloc(1024);
     const int count = names ? list(&names) : -1;
@@ -119,7 +135,7 @@ int Listed(Outcome &outcome, List list)
     return count < 0 ? -1 : 0;
 }
 
-int Number(int result, Outcome &outcome)
+int ShowNumber(Outcome &outcome, int result)
 {
     outcome.Say(result);
     return result < 0 ? -1 : 0;
@@ -149,109 +165,58 @@ struct Call {
     bool changes = false;
 };
 
+int SetPassword()
+{
+    TAVOUSER user = {};
+    user.szName = const_cast<char *>("alice");
+    const TAVOUSER *const users[] = {&user};
+    const char *const hash[] = {"$1$ab$0123456789012345678901"};
+    const char *const digits[] = {"0123456789ABCDEF0123456789ABCDEF"};
+    return TAVOUserSetPasswd(users, hash, digits, digits, 1);
+}
+
 const char *const kAlice[] = {"alice"};
 const char *const kStaff[] = {"staff"};
+const char *const kNames[] = {"alice", "nobody else", "bob", nullptr};
+
+#define READS(expression)                                                                                              \
+    [](Outcome &outcome) -> int {                                                                                      \
+        return expression;                                                                                             \
+    }
+#define CHANGES(expression) [](Outcome &) -> int { return expression; }, true
 
 constexpr Call kCalls[] = {
-    {"get user",
-     [](Outcome &outcome) {
-         TAVOUSER *user = nullptr;
-         const int result = TAVOUserGet("alice", &user);
-         return ShowUser(result, user, outcome);
-     }},
-    {"get user with accents",
-     [](Outcome &outcome) {
-         TAVOUSER *user = nullptr;
-         const int result = TAVOUserGet("zo\xC3\xAB", &user);
-         return ShowUser(result, user, outcome);
-     }},
-    {"get user by id",
-     [](Outcome &outcome) {
-         TAVOUSER *user = nullptr;
-         const int result = TAVOUserGetByUID(1025, &user);
-         return ShowUser(result, user, outcome);
-     }},
-    {"list users",
-     [](Outcome &outcome) {
-         return Listed(outcome, [](TLIBSZLIST **names) { return TAVOUserEnum(names, TAVO_USER_LOCAL); });
-     }},
-    {"count users",
-     [](Outcome &outcome) {
-         return Number(TAVOUserTotalNum(TAVO_USER_LOCAL), outcome);
-     }},
-    {"privilege",
-     [](Outcome &outcome) {
-         return Number(TAVOUserPrivilegeGet("alice"), outcome);
-     }},
-    {"expiry",
-     [](Outcome &outcome) {
-         return Number(TAVOUserCheckExpired("alice"), outcome);
-     }},
-    {"valid users",
-     [](Outcome &outcome) {
-         const char *const names[] = {"alice", "nobody else", "bob", nullptr};
-         char valid[64] = "";
-         const int length = TAVOUserGetValidUserList(names, valid, sizeof valid);
-         outcome.Say(length < 0 ? "" : valid);
-         return length < 0 ? -1 : 0;
-     }},
-    {"get group",
-     [](Outcome &outcome) {
-         TAVOGROUP *group = nullptr;
-         const int result = TAVOGroupGet("staff", &group);
-         return ShowGroup(result, group, outcome);
-     }},
-    {"get group by id",
-     [](Outcome &outcome) {
-         TAVOGROUP *group = nullptr;
-         const int result = TAVOGroupGetByGID(101, &group);
-         return ShowGroup(result, group, outcome);
-     }},
-    {"list groups",
-     [](Outcome &outcome) {
-         return Listed(outcome, [](TLIBSZLIST **names) { return TAVOGroupEnum(names, TAVO_GROUP_LOCAL); });
-     }},
-    {"list members",
-     [](Outcome &outcome) {
-         return Listed(outcome, [](TLIBSZLIST **names) { return TAVOGroupListMember("staff", names); });
-     }},
-    {"list everybody",
-     [](Outcome &outcome) {
-         return Listed(outcome, [](TLIBSZLIST **names) { return TAVOGroupListMember("users", names); });
-     }},
-    {"describe group",
-     [](Outcome &outcome) {
-         char text[64] = "";
-         const int length = TAVOGroupDescGet("staff", text, sizeof text);
-         outcome.Say(length < 0 ? "" : text);
-         return length < 0 ? -1 : 0;
-     }},
-    {"model's quotas",
-     [](Outcome &outcome) {
-         return Number(TAVOSupportQUOTA(), outcome);
-     }},
+    {"get user", READS(ShowUser(outcome, TAVOUserGet, "alice"))},
+    {"get user with accents", READS(ShowUser(outcome, TAVOUserGet, "zo\xC3\xAB"))},
+    {"get user by id", READS(ShowUser(outcome, TAVOUserGetByUID, 1025))},
+    {"list users", READS(ShowList(outcome, [](auto **names) { return TAVOUserEnum(names, TAVO_USER_LOCAL); }))},
+    {"count users", READS(ShowNumber(outcome, TAVOUserTotalNum(TAVO_USER_LOCAL)))},
+    {"privilege", READS(ShowNumber(outcome, TAVOUserPrivilegeGet("alice")))},
+    {"expiry", READS(ShowNumber(outcome, TAVOUserCheckExpired("alice")))},
+    {"valid users", READS(ShowText(outcome, TAVOUserGetValidUserList, kNames))},
+    {"get group", READS(ShowGroup(outcome, TAVOGroupGet, "staff"))},
+    {"get group by id", READS(ShowGroup(outcome, TAVOGroupGetByGID, 101))},
+    {"list groups", READS(ShowList(outcome, [](auto **names) { return TAVOGroupEnum(names, TAVO_GROUP_LOCAL); }))},
+    {"list members", READS(ShowList(outcome, [](auto **names) { return TAVOGroupListMember("staff", names); }))},
+    {"list everybody", READS(ShowList(outcome, [](auto **names) { return TAVOGroupListMember("users", names); }))},
+    {"describe group", READS(ShowText(outcome, TAVOGroupDescGet, "staff"))},
+    {"model's quotas", READS(ShowNumber(outcome, TAVOSupportQUOTA()))},
     {"own store", UseStore},
-    {"add user", [](Outcome &) { return Set(nullptr, "dave", "dave"); }, true},
-    {"change user", [](Outcome &) { return Set("bob", "bob", "other"); }, true},
-    {"rename user", [](Outcome &) { return Set("alice", "anna", "x"); }, true},
-    {"set password",
-     [](Outcome &) {
-         TAVOUSER user = {};
-         user.szName = const_cast<char *>("alice");
-         const TAVOUSER *const users[] = {&user};
-         const char *const hash[] = {"$1$ab$0123456789012345678901"};
-         const char *const digits[] = {"0123456789ABCDEF0123456789ABCDEF"};
-         return TAVOUserSetPasswd(users, hash, digits, digits, 1);
-     },
-     true},
-    {"lock user", [](Outcome &) { return TAVOUserLockSet("alice", 1); }, true},
-    {"age password", [](Outcome &) { return TAVOUserAgingSet("alice", 1, 90, 14); }, true},
-    {"delete user", [](Outcome &) { return TAVOUserDelete(kAlice, 1); }, true},
-    {"add group", [](Outcome &) { return SetGroup(nullptr, "crew"); }, true},
-    {"rename group", [](Outcome &) { return SetGroup("staff", "crew"); }, true},
-    {"describe", [](Outcome &) { return TAVOGroupDescSet("staff", "new"); }, true},
-    {"delete group", [](Outcome &) { return TAVOGroupDelete(kStaff, 1); }, true},
+    {"add user", CHANGES(Set(nullptr, "dave", "dave"))},
+    {"change user", CHANGES(Set("bob", "bob", "other"))},
+    {"rename user", CHANGES(Set("alice", "anna", "x"))},
+    {"set password", CHANGES(SetPassword())},
+    {"lock user", CHANGES(TAVOUserLockSet("alice", 1))},
+    {"age password", CHANGES(TAVOUserAgingSet("alice", 1, 90, 14))},
+    {"delete user", CHANGES(TAVOUserDelete(kAlice, 1))},
+    {"add group", CHANGES(SetGroup(nullptr, "crew"))},
+    {"rename group", CHANGES(SetGroup("staff", "crew"))},
+    {"describe", CHANGES(TAVOGroupDescSet("staff", "new"))},
+    {"delete group", CHANGES(TAVOGroupDelete(kStaff, 1))},
 };
+
+#undef READS
+#undef CHANGES
 
 bool Long()
 {
