@@ -2,12 +2,12 @@
 #include "support/machine.h"
 
 #include "support/appliance_root.h"
+#include "support/eventually.h"
 
 #include <cstdio>
 
 #include <sys/stat.h>
 #include <sys/wait.h>
-#include <unistd.h>
 
 namespace test {
 
@@ -46,12 +46,7 @@ void Happen(const std::string &event)
 
 bool Comes(const std::function<bool()> &condition)
 {
-    for (int i = 0; i < 1200; ++i) {
-        if (condition())
-            return true;
-        ::usleep(100'000);
-    }
-    return false;
+    return Eventually(condition);
 }
 
 }  // namespace test

@@ -100,10 +100,6 @@ class TimeLimit {
 
 // How this processor's registers describe a system call and its result. Number -1 means none: the kernel makes no call,
 // and the result is whatever the registers hold then.
-#if defined(__x86_64__) || defined(__arm__)
-
-constexpr bool kKnowsRegisters = true;
-
 bool SkipCall(pid_t child)
 {
 #ifdef __arm__
@@ -134,22 +130,6 @@ bool SetResult(pid_t child, long result)
 #endif
     return ::ptrace(PTRACE_SETREGS, child, nullptr, &registers) == 0;
 }
-
-#else
-
-constexpr bool kKnowsRegisters = false;
-
-bool SkipCall(pid_t)
-{
-    return false;
-}
-
-bool SetResult(pid_t, long)
-{
-    return false;
-}
-
-#endif
 
 struct Verdict {
     enum { go_on, fail, die } what = go_on;
@@ -243,8 +223,6 @@ constexpr int kLongest = 60;  // seconds for what is not supposed to fail
 
 bool CanTrace()
 {
-    if (!kKnowsRegisters)
-        return false;
     bool entered = false;
     const Ending ending = RunTraced([] { ::syscall(SYS_getppid); }, kLongest,
                                     [&](const SystemCall &call) {

@@ -80,16 +80,26 @@ bool Settle(const std::string &host_name)
     ::_exit(StatusOf(init));
 }
 
+[[noreturn]] void BecomeShell(const std::string &command)
+{
+    ::execl("/bin/sh", "sh", "-c", command.c_str(), nullptr);
+    ::_exit(127);
+}
+
+template <class Body>
+int InFork(Body body)
+{
+    const pid_t pid = ::fork();
+    if (pid == 0)
+        body();
+    return StatusOf(pid);
+}
+
 }  // namespace
 
 int ShellStatus(const std::string &command)
 {
-    const pid_t pid = ::fork();
-    if (pid == 0) {
-        ::execl("/bin/sh", "sh", "-c", command.c_str(), nullptr);
-        ::_exit(127);
-    }
-    return StatusOf(pid);
+    return InFork([&] { BecomeShell(command); });
 }
 
 Node::Node(const std::string &host_name)
@@ -140,40 +150,32 @@ void Node::Enter() const
 
 bool Node::Run(const std::function<bool()> &body) const
 {
-    const pid_t pid = ::fork();
-    if (pid == 0) {
-        Enter();
-        const bool done = body() && !testing::Test::HasFailure();
-        std::fflush(nullptr);
-        ::_exit(done ? 0 : 1);
-    }
-    return StatusOf(pid) == 0;
+    return InFork([&] {
+               Enter();
+               const bool done = body() && !testing::Test::HasFailure();
+               std::fflush(nullptr);
+               ::_exit(done ? 0 : 1);
+           }) == 0;
 }
 
 int Node::Shell(const std::string &command) const
 {
-    const pid_t pid = ::fork();
-    if (pid == 0) {
+    return InFork([&] {
         Enter();
-        ::execl("/bin/sh", "sh", "-c", command.c_str(), nullptr);
-        ::_exit(127);
-    }
-    return StatusOf(pid);
+        BecomeShell(command);
+    });
 }
 
 std::string Node::Output(const std::string &command) const
 {
     const ScratchDir dir;
     const std::string file = dir / "output";
-    const pid_t pid = ::fork();
-    if (pid == 0) {
+    InFork([&] {
         const int out = ::open(file.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600);  // here, where the test can read it
         ::dup2(out, 1);
         Enter();
-        ::execl("/bin/sh", "sh", "-c", command.c_str(), nullptr);
-        ::_exit(127);
-    }
-    StatusOf(pid);
+        BecomeShell(command);
+    });
     return ReadFile(file);
 }
 
