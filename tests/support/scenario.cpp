@@ -14,12 +14,6 @@ ScriptedCall &ScriptedCall::Prints(std::string_view text)
     return *this;
 }
 
-ScriptedCall &ScriptedCall::PrintsError(std::string_view text)
-{
-    scenario::Write(path_ / "stderr", text);
-    return *this;
-}
-
 ScriptedCall &ScriptedCall::Exits(int status)
 {
     scenario::Write(path_ / "status", std::to_string(status));

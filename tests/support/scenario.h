@@ -15,7 +15,6 @@ class ScriptedCall {
     explicit ScriptedCall(std::filesystem::path path) : path_(std::move(path)) {}
 
     ScriptedCall &Prints(std::string_view text);
-    ScriptedCall &PrintsError(std::string_view text);
     ScriptedCall &Exits(int status);
     ScriptedCall &DiesOf(int signal);
     ScriptedCall &Times(int count);

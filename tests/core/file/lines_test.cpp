@@ -2,6 +2,7 @@
 #include "tavo_file.h"
 
 #include "support/fault_state.h"
+#include "support/owned_container.h"
 #include "support/scratch_dir.h"
 
 #include <gmock/gmock.h>
@@ -120,14 +121,11 @@ TEST_F(LinesTest, EditsALine)
 TEST_F(LinesTest, ReadsEveryLineIntoAList)
 {
     test::WriteFile(file_, "one\n\n" + std::string(5000, 'x') + "\nend");
-    TLIBSZLIST *list = PslTLIBSzListAlloc(0);
-    TLIBSzListPush(&list, "held before");
-    EXPECT_EQ(TLIBFileReadLines(path_, &list), 5);
-    const std::vector<std::string> items(list->pszItem, list->pszItem + list->nItem);
-    EXPECT_THAT(items, ElementsAre("held before", "one", "", std::string(5000, 'x'), "end"));
-    TLIBSzListFree(list);
-    list = nullptr;
-    EXPECT_EQ(TLIBFileReadLines(path_, &list), -1);
+    test::Owned<TLIBSZLIST> list = test::ListOf({"held before"});
+    EXPECT_EQ(TLIBFileReadLines(path_, list), 5);
+    EXPECT_THAT(test::Items(list), ElementsAre("held before", "one", "", std::string(5000, 'x'), "end"));
+    TLIBSZLIST *none = nullptr;
+    EXPECT_EQ(TLIBFileReadLines(path_, &none), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_read_lines"}));
 }
 

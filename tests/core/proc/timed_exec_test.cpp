@@ -114,28 +114,15 @@ TEST(TimedExec, StatusIsTheResult)
 TEST(TimedExec, TheLimitIsExact)
 {
     const struct {
-        const char *what;
         std::function<void()> prepare;
+        const char *what;
     } surroundings[] = {
-        {"plain",
-         [] {
-         }},
-        {"other children die", HaveChildrenDie},
-        {"SIGCHLD ignored",
-         [] {
-             ::signal(SIGCHLD, SIG_IGN);
-         }},
-        {"SIGCHLD ignored, others die",
-         [] {
-             ::signal(SIGCHLD, SIG_IGN);
-             HaveChildrenDie();
-         }},
-        {"SIGCHLD blocked", BlockChildSignal},
-        {"called before",
-         [] {
-             TLIBTimedExec(9, "/bin/true", NULL);
-             HaveChildrenDie();
-         }},
+        {[] {}, "plain"},
+        {HaveChildrenDie, "other children die"},
+        {[] { ::signal(SIGCHLD, SIG_IGN); }, "SIGCHLD ignored"},
+        {[] { ::signal(SIGCHLD, SIG_IGN), HaveChildrenDie(); }, "SIGCHLD ignored, others die"},
+        {BlockChildSignal, "SIGCHLD blocked"},
+        {[] { TLIBTimedExec(9, "/bin/true", NULL), HaveChildrenDie(); }, "called before"},
     };
     struct Case {
         const char *program;  // how long it takes

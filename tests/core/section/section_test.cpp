@@ -1,8 +1,8 @@
 // Files with sections: headers, reading, rewriting, appending.
 #include "tavo_section.h"
 
-#include "support/owned_container.h"
 #include "support/fault_state.h"
+#include "support/owned_container.h"
 #include "support/scratch_dir.h"
 
 #include <gmock/gmock.h>
@@ -80,21 +80,18 @@ TEST_F(SectionTest, ReadsTheFirstSectionOfAName)
 TEST_F(SectionTest, ListsSections)
 {
     test::WriteFile(file_, "[a]\nx=1\n[ b ] \n[broken\n[]\n[c]d]\n" + ("[" + std::string(1020, 'n') + "]\n"));
-    TLIBSZLIST *list = PslTLIBSzListAlloc(0);
-    TLIBSzListPush(&list, "held before");
-    EXPECT_EQ(TLIBFileEnumSection(path_, &list), 6);
-    std::vector<std::string> names(list->pszItem, list->pszItem + list->nItem);
-    EXPECT_THAT(names, ElementsAre("held before", "a", " b ", "", "c]d", std::string(1020, 'n')));
+    Owned<TLIBSZLIST> list = test::ListOf({"held before"});
+    EXPECT_EQ(TLIBFileEnumSection(path_, list), 6);
+    EXPECT_THAT(test::Items(list), ElementsAre("held before", "a", " b ", "", "c]d", std::string(1020, 'n')));
 
     TLIBSzListRemoveAll(list);
     test::WriteFile(file_, "[a]\n[" + std::string(1021, 'n') + "]\n[b]\n");
-    EXPECT_EQ(TLIBFileEnumSection(path_, &list), -1);
+    EXPECT_EQ(TLIBFileEnumSection(path_, list), -1);
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS) << "a header that is too long sets no code";
-    EXPECT_EQ(TLIBFileEnumSection("/", &list), -1);
+    EXPECT_EQ(TLIBFileEnumSection("/", list), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "file_enum_section"}));
     EXPECT_EQ(TLIBFileEnumSection(path_, nullptr), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_enum_section"}));
-    TLIBSzListFree(list);
 }
 
 constexpr const char *kText = "top=0\n[net]\nold=1\n# stays\n[broken\nlost=1\n[other]\no=1\n[net]\nold=2\n;too\n";
