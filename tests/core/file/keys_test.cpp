@@ -2,8 +2,8 @@
 #include "tavo_file.h"
 
 #include "support/captured_log.h"
-#include "support/owned_container.h"
 #include "support/fault_state.h"
+#include "support/owned_container.h"
 #include "support/scratch_dir.h"
 
 #include <gmock/gmock.h>

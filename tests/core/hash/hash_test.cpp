@@ -2,8 +2,8 @@
 #include "tavo_hash.h"
 
 #include "support/container_text.h"
-#include "support/owned_container.h"
 #include "support/fault_state.h"
+#include "support/owned_container.h"
 
 #include <gmock/gmock.h>
 

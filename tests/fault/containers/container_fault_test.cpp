@@ -5,9 +5,9 @@
 #include "tavo_str.h"
 
 #include "support/container_text.h"
-#include "support/owned_container.h"
 #include "support/failing_malloc.h"
 #include "support/fault_state.h"
+#include "support/owned_container.h"
 
 #include <gtest/gtest.h>
 
