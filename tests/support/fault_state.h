@@ -34,6 +34,12 @@ inline std::ostream &operator<<(std::ostream &out, const Fault &fault)
     return out << std::hex << std::showbase << fault.code << std::dec << " from " << fault.module << ":" << fault.line;
 }
 
+// The fault of a call that fails with -1; none for any other result.
+inline Fault FaultOf(int result)
+{
+    return result == -1 ? LastFault() : Fault{};
+}
+
 // Clears the state, so that a test sees exactly what the next call sets.
 inline void ForgetFault()
 {

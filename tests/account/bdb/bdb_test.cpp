@@ -23,6 +23,7 @@
 
 using namespace std::string_literals;
 using test::Fault;
+using test::FaultOf;
 using test::LastFault;
 
 namespace {
@@ -97,10 +98,9 @@ TEST(Bdb, KeepsBytesAcrossOpens)
         EXPECT_EQ(Get(store, "GONE"s), "(none)");
         EXPECT_EQ(LastFault(), (Fault{ERR_KEY_NOT_FOUND, "bdb_get"}));
         testing::internal::CaptureStderr();
-        EXPECT_EQ(TAVOBDbDelete(store.get(), "KEY", 3), -1) << "opened for reading";
-        EXPECT_EQ(LastFault(), (Fault{ERR_DB_DELETE, "bdb_delete"}));
-        EXPECT_EQ(Set(store, "KEY"s, "x"s), -1);
-        EXPECT_EQ(LastFault(), (Fault{ERR_DB_STORE, "bdb_set"}));
+        EXPECT_EQ(FaultOf(TAVOBDbDelete(store.get(), "KEY", 3)), (Fault{ERR_DB_DELETE, "bdb_delete"}))
+            << "opened for reading";
+        EXPECT_EQ(FaultOf(Set(store, "KEY"s, "x"s)), (Fault{ERR_DB_STORE, "bdb_set"}));
         EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
     }
     EXPECT_EQ(dir.Names(), (std::vector<std::string>{"store0", "store1"})) << "nothing lies beside them";
@@ -136,8 +136,7 @@ TEST(Bdb, CursorTypes)
         TAVOBDbFree(value);
     }
     for (const int type : {0, 6, -1})
-        EXPECT_EQ(TAVOBDbCursorSetType(store.get(), type), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "bdb_cursor_set_type"}));
+        EXPECT_EQ(FaultOf(TAVOBDbCursorSetType(store.get(), type)), (Fault{ERR_BAD_PARAMETERS, "bdb_cursor_set_type"}));
 }
 
 TEST(Bdb, ReservedKeysHaveTheirLengths)
@@ -187,8 +186,8 @@ TEST(Bdb, DomainPartGoesStale)
         EXPECT_EQ(TAVOBDbIsNeedToDomainRebuild(store.get()), row.stale) << row.age;
     }
     EXPECT_EQ(TAVOBDbDomainExpireTimeDelete(store.get()), 0);
-    EXPECT_EQ(TAVOBDbDomainExpireTimeDelete(store.get()), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_KEY_NOT_FOUND, "bdb_domain_expire_time_delete"}));
+    EXPECT_EQ(FaultOf(TAVOBDbDomainExpireTimeDelete(store.get())),
+              (Fault{ERR_KEY_NOT_FOUND, "bdb_domain_expire_time_delete"}));
 }
 
 // Files that are not stores are deleted, never followed, never waited for, and the database prints nothing.
@@ -207,42 +206,21 @@ TEST(Bdb, RemovesForeignFiles)
     ::unlink(path.c_str());
     test::WriteFile(outside, "mine\n", 0600);
 
+    const auto put = [&](const std::string &text) {
+        test::WriteFile(path, text);
+    };
     const struct {
-        const char *name;
         std::function<void()> plant;
+        const char *name;
     } rows[] = {
-        {"garbage",
-         [&] {
-             test::WriteFile(path, "this is no store\n");
-         }},
-        {"zeros",
-         [&] {
-             test::WriteFile(path, std::string(65536, '\0'));
-         }},
-        {"cut",
-         [&] {
-             test::WriteFile(path, whole.substr(0, 20000));
-         }},
-        {"only its head",
-         [&] {
-             test::WriteFile(path, whole.substr(0, 100));
-         }},
-        {"other magic",
-         [&] {
-             test::WriteFile(path, whole.substr(0, 12) + "\x61\x15\x06" + whole.substr(15));
-         }},
-        {"odd page size",
-         [&] {
-             test::WriteFile(path, whole.substr(0, 20) + "\x01\x10\0\0"s + whole.substr(24));
-         }},
-        {"link",
-         [&] {
-             ASSERT_EQ(::symlink(outside.c_str(), path.c_str()), 0);
-         }},
-        {"FIFO",
-         [&] {
-             ASSERT_EQ(::mkfifo(path.c_str(), 0666), 0);
-         }},
+        {[&] { put("this is no store\n"); }, "garbage"},
+        {[&] { put(std::string(65536, '\0')); }, "zeros"},
+        {[&] { put(whole.substr(0, 20000)); }, "cut"},
+        {[&] { put(whole.substr(0, 100)); }, "only its head"},
+        {[&] { put(whole.substr(0, 12) + "\x61\x15\x06" + whole.substr(15)); }, "other magic"},
+        {[&] { put(whole.substr(0, 20) + "\x01\x10\0\0"s + whole.substr(24)); }, "odd page size"},
+        {[&] { ASSERT_EQ(::symlink(outside.c_str(), path.c_str()), 0); }, "link"},
+        {[&] { ASSERT_EQ(::mkfifo(path.c_str(), 0666), 0); }, "FIFO"},
     };
     test::CapturedLog log;
     for (const auto &row : rows) {
@@ -337,13 +315,12 @@ TEST(Bdb, Refuses)
     };
     for (const auto &call : calls) {
         test::ForgetFault();
-        EXPECT_EQ(call(), -1);
-        EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+        EXPECT_EQ(FaultOf(call()).code, ERR_BAD_PARAMETERS);
     }
     TAVOBDbFree(nullptr);
     EXPECT_EQ(Set(store, "#TAVO@SYNC@TIME", "five."), 0);
-    EXPECT_EQ(TAVOBDbConfSyncTimeGet(store.get(), &number), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_DB_CURSOR, "bdb_conf_sync_time_get"})) << "no number";
+    EXPECT_EQ(FaultOf(TAVOBDbConfSyncTimeGet(store.get(), &number)), (Fault{ERR_DB_CURSOR, "bdb_conf_sync_time_get"}))
+        << "no number";
 }
 
 }  // namespace

@@ -2,10 +2,10 @@
 #include "tavo_quota.h"
 #include "tavo_user.h"
 
+#include "account/user/user_fixture.h"
 #include "support/captured_log.h"
 #include "support/fault_state.h"
 #include "support/scenario.h"
-#include "support/scratch_dir.h"
 
 #include <gmock/gmock.h>
 
@@ -17,6 +17,8 @@
 #include <mntent.h>
 #include <stdio.h>
 #include <sys/quota.h>
+
+using test::FaultOf;
 
 namespace {
 
@@ -76,10 +78,7 @@ class Quota : public testing::Test {
         kernel_calls.clear();
         kernel_errno = 0;
         failing_device.clear();
-        TAVOUSER *user = nullptr;
-        TAVOUserAlloc(&user, "alice", "", 2000, -1, "", "", "", -1, 0, "", 0);
-        TAVOUserSetOne(nullptr, user);
-        TAVOUserFree(user);
+        test::AddUser({.name = "alice", .uid = 2000});
         test::ForgetFault();
     }
 };
@@ -146,8 +145,7 @@ TEST_F(Quota, RefusalsReachNoKernel)
         EXPECT_EQ(Set(row.user, row.device, row.limit), row.code) << (row.user ? row.user : "NULL");
     EXPECT_EQ(TAVOQuotaSet("alice", kDevice, nullptr), -1);
     TAVOQUOTA quota = {7, 8};
-    EXPECT_EQ(TAVOQuotaGet("users", kDevice, &quota), -1);
-    EXPECT_EQ(TLIBErrGet(), ERR_SYS_UNKNOWN);
+    EXPECT_EQ(FaultOf(TAVOQuotaGet("users", kDevice, &quota)).code, ERR_SYS_UNKNOWN);
     EXPECT_EQ(TAVOQuotaGet("alice", kDevice, nullptr), -1);
     EXPECT_TRUE(kernel_calls.empty());
     EXPECT_EQ(quota.rLimit, 7);
@@ -167,8 +165,7 @@ TEST_F(Quota, KernelErrorsAreCodes)
     for (const auto &row : rows) {
         kernel_errno = row.error;
         EXPECT_EQ(Set("alice", kDevice, 1), row.set) << row.error;
-        EXPECT_EQ(TAVOQuotaGet("alice", kDevice, &quota), -1);
-        EXPECT_EQ(test::LastFault(), (test::Fault{row.get, "quota_get"})) << row.error;
+        EXPECT_EQ(FaultOf(TAVOQuotaGet("alice", kDevice, &quota)), (test::Fault{row.get, "quota_get"})) << row.error;
         EXPECT_EQ(TAVOQuotaFmtGet(kDevice), -1);
     }
     EXPECT_EQ(quota.cbUsed, 8u);
@@ -194,8 +191,7 @@ TEST_F(Quota, CleansWhoIsThereOnEveryVolume)
     TLIBSZLIST *users = PslTLIBSzListAlloc(512);
     for (const char *name : {"ghost", "", "alice"})
         TLIBSzListPush(&users, name);
-    EXPECT_EQ(TAVOQuotaClean(users, kDevice), -1);
-    EXPECT_EQ(test::LastFault(), (test::Fault{ERR_NO_SUCH_USER, "quota_clean"}));
+    EXPECT_EQ(FaultOf(TAVOQuotaClean(users, kDevice)), (test::Fault{ERR_NO_SUCH_USER, "quota_clean"}));
     EXPECT_EQ(kernel_calls.size(), 2u) << "alice, after the failure";
 
     TLIBSzListRemoveAll(users);
@@ -230,32 +226,23 @@ const std::vector<std::string> kOff{"quotaoff", "/volume1"};
 TEST_F(Quota, SwitchesInSteps)
 {
     mounts = "/dev/md2 /volume1 ext4 rw 0 0\n";
-    const struct {
-        std::vector<std::vector<std::string>> commands;
-        int code;  // when the last of them fails
-    } rows[] = {{{kRemount}, ERR_QUOTA_REMOUNT},
-                {{kRemount, kCheck}, ERR_QUOTA_CHECK},
-                {{kRemount, kCheck, kOn}, ERR_QUOTA_ON}};
-    for (const auto &row : rows) {
+    const std::vector<std::string> steps[] = {kRemount, kCheck, kOn};
+    const int codes[] = {ERR_QUOTA_REMOUNT, ERR_QUOTA_CHECK, ERR_QUOTA_ON};
+    for (size_t failing = 0; failing <= std::size(steps); ++failing) {
         test::Scenario scenario;
-        for (const auto &command : row.commands)
-            scenario.Expect(command).Exits(&command == &row.commands.back() ? 1 : 0);
-        EXPECT_EQ(TAVOQuotaInit(1), -1);
-        EXPECT_EQ(test::LastFault(), (test::Fault{row.code, "quota_init"}));
-    }
-    {
-        test::Scenario scenario;
-        for (const auto &command : {kRemount, kCheck, kOn})
-            scenario.Expect(command);
-        EXPECT_EQ(TAVOQuotaInit(1), 0);
+        for (size_t i = 0; i < std::size(steps) && i <= failing; ++i)
+            scenario.Expect(steps[i]).Exits(i == failing ? 1 : 0);
+        EXPECT_EQ(TAVOQuotaInit(1), failing < std::size(steps) ? -1 : 0) << failing;
+        if (failing < std::size(steps)) {
+            EXPECT_EQ(test::LastFault(), (test::Fault{codes[failing], "quota_init"}));
+        }
     }
     {
         test::Scenario scenario;
         scenario.Expect(kOff);
         scenario.Expect(kOff).Exits(2);
         EXPECT_EQ(TAVOQuotaOff(1), 0);
-        EXPECT_EQ(TAVOQuotaOff(1), -1);
-        EXPECT_EQ(TLIBErrGet(), ERR_QUOTA_OFF);
+        EXPECT_EQ(FaultOf(TAVOQuotaOff(1)).code, ERR_QUOTA_OFF);
     }
 }
 
@@ -264,10 +251,8 @@ TEST_F(Quota, NothingRunsOnAVolumeThatIsNotMounted)
     test::Scenario scenario;
     mounts = "/dev/md2 /volume10 ext4 rw 0 0\n/dev/volume1 /mnt/volume1 ext4 rw 0 0\n";
     for (const int volume : {1, 0, -1, 101}) {
-        EXPECT_EQ(TAVOQuotaInit(volume), -1) << volume;
-        EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
-        EXPECT_EQ(TAVOQuotaOff(volume), -1);
-        EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+        EXPECT_EQ(FaultOf(TAVOQuotaInit(volume)).code, ERR_BAD_PARAMETERS) << volume;
+        EXPECT_EQ(FaultOf(TAVOQuotaOff(volume)).code, ERR_BAD_PARAMETERS);
     }
 }
 
