@@ -9,7 +9,6 @@
 
 #include <filesystem>
 #include <map>
-#include <utility>
 
 namespace test {
 
@@ -50,21 +49,6 @@ inline void PutBack(const Files &files)
     }
 }
 
-inline void SetUsers(const std::vector<std::pair<const char *, const char *>> &changes, const char *password)
-{
-    std::vector<TAVOUSER *> users;
-    std::vector<const char *> old_names;
-    for (const auto &[old_name, name] : changes) {
-        TAVOUSER *user = nullptr;
-        TAVOUserAlloc(&user, name, password, -1, -1, "", "", "", -1, 0, "", 0);
-        users.push_back(user);
-        old_names.push_back(old_name);
-    }
-    TAVOUserSet(old_names.data(), users.data(), static_cast<int>(users.size()));
-    for (TAVOUSER *user : users)
-        TAVOUserFree(user);
-}
-
 // Accounts that every neighbour knows.
 inline void StartKnownEverywhere()
 {
@@ -73,7 +57,7 @@ inline void StartKnownEverywhere()
     std::filesystem::create_directories("/usr/tavo/etc");
     WriteFile("/etc/tavoinfo.conf", "userHomeEnable=\"yes\"\n");
     WriteFile("/etc.defaults/tavoinfo.conf", "netbkp=\"yes\"\nmaxaccounts=\"2048\"\n");
-    SetUsers({{nullptr, "alice"}, {nullptr, "bob"}, {nullptr, "carol"}}, "secret");
+    ASSERT_EQ(SetUsers({{"", "alice"}, {"", "bob"}, {"", "carol"}}, "secret"), 0);
     ASSERT_EQ(AddGroup("staff", -1, {"alice", "bob", "carol"}), 0);
     ASSERT_EQ(TAVOGroupDescSet("staff", "old hands"), 0);
     WriteFile("/usr/tavo/etc/smb.conf", "[x]\n\tvalid users = alice,@staff,bob,carol\n\twrite list = \"bob\"\n");

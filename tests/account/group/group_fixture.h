@@ -3,14 +3,12 @@
 #define TESTS_ACCOUNT_GROUP_GROUP_FIXTURE_H
 
 #include "tavo_group.h"
-#include "tavo_user.h"
 
-#include "support/scratch_dir.h"
+#include "account/user/user_fixture.h"
 
-#include <filesystem>
 #include <memory>
-#include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace test {
@@ -61,13 +59,9 @@ inline int DeleteGroups(std::vector<const char *> names)
     return result == 0 ? TLIBErrGet() : CodeOf(result);
 }
 
-inline int AddUser(const std::string &name)
+inline int AddUser(const char *name)
 {
-    TAVOUSER *user = nullptr;
-    TAVOUserAlloc(&user, name.c_str(), "", -1, -1, "", "", "", -1, 0, "", 0);
-    const int result = TAVOUserSetOne(nullptr, user);
-    TAVOUserFree(user);
-    return CodeOf(result);
+    return AddUser(UserTexts{.name = name});
 }
 
 inline Group GetGroup(const std::string &name)
@@ -82,11 +76,6 @@ inline Names Members(const TAVOGROUP &group)
     for (char **member = group.rgszMember; *member; ++member)
         names.emplace_back(*member);
     return names;
-}
-
-inline std::string FileText(const char *path)
-{
-    return std::filesystem::exists(path) ? ReadFile(path) : std::string();
 }
 
 inline std::string GroupFile()

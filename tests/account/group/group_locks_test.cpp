@@ -1,20 +1,16 @@
-// Changes of accounts take the locks in one order, so that they cannot deadlock, and nothing is lost when many programs
-// make them at once.
+// Changes of accounts take the locks in one order, so that they cannot deadlock.
 #include "tavo_lock.h"
 
 #include "account/group/group_fixture.h"
-#include "support/rounds.h"
 
 #include <gtest/gtest.h>
 
-#include <functional>
 #include <set>
-#include <sstream>
+#include <string>
+#include <vector>
 
 #include <dlfcn.h>
 #include <sys/file.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 namespace {
 
@@ -50,17 +46,13 @@ struct Row {
     test::Names expected;  // taken exclusively
 };
 
-int UserChange(const char *old_name, const char *new_name)
+int UserChange(const std::string &old_name, const std::string &new_name)
 {
-    TAVOUSER *user = nullptr;
-    TAVOUserAlloc(&user, new_name, "x", -1, -1, "", "", "", -1, 0, "", 0);
-    const int result = TAVOUserSetOne(old_name, user);
-    TAVOUserFree(user);
-    return result;
+    return test::SetUsers({{old_name, new_name}}, "x");
 }
 
 const Row rows[] = {
-    {"add a user", [] { return UserChange(nullptr, "alice"); }, {"+lock_pw", "+lock_gr", "+lock_smb"}},
+    {"add a user", [] { return UserChange("", "alice"); }, {"+lock_pw", "+lock_gr", "+lock_smb"}},
     {"add a group", [] { return test::AddGroup("staff", -1, {"alice"}); }, {"+lock_pw", "+lock_gr", "+lock_smb"}},
     {"describe a group", [] { return TAVOGroupDescSet("staff", "text"); }, {"+lock_gr"}},
     {"rename a user of a group", [] { return UserChange("alice", "alina"); }, {"+lock_pw", "+lock_gr", "+lock_smb"}},
@@ -78,12 +70,7 @@ const Row rows[] = {
      },
      {"+lock_pw"}},
     {"delete a group", [] { return test::DeleteGroups({"crew"}); }, {"+lock_gr", "+lock_smb"}},
-    {"delete a user",
-     [] {
-         const char *const names[] = {"alina"};
-         return TAVOUserDelete(names, 1);
-     },
-     {"+lock_pw", "+lock_gr", "+lock_smb"}},
+    {"delete a user", [] { return test::DeleteUser("alina"); }, {"+lock_pw", "+lock_gr", "+lock_smb"}},
 };
 
 TEST(AccountLocks, AreTakenInOneOrder)
@@ -116,94 +103,6 @@ TEST(AccountLocks, AreTakenInOneOrder)
         EXPECT_EQ(taken, row.expected) << row.what;
         EXPECT_TRUE(held.empty()) << row.what;
     }
-}
-
-int UntilUnlocked(const std::function<int()> &change)
-{
-    int code = ERR_LOCK_FAILED;
-    for (int tries = 0; tries < 20 && code == ERR_LOCK_FAILED; ++tries)
-        code = change();
-    return code;
-}
-
-std::set<std::string> Found(const std::string &text)
-{
-    std::set<std::string> names;
-    std::istringstream lines(text);
-    for (std::string line; std::getline(lines, line);)
-        if (line.starts_with("w"))
-            names.insert(line.substr(0, line.find(':')));
-    return names;
-}
-
-// Each worker has groups of its own and one user in all of them, whom it renames meanwhile.
-TEST(GroupConcurrency, WorkersAddChangeDeleteGroupsAndRenameTheirMembers)
-{
-    constexpr int workers = 16;
-    const int steps = test::Rounds(5000 / workers);
-    std::vector<pid_t> children;
-    for (int worker = 0; worker < workers; ++worker) {
-        children.push_back(::fork());
-        if (children.back() != 0)
-            continue;
-        std::string user = "w" + std::to_string(worker) + "_u";
-        int code = UntilUnlocked([&] { return test::AddUser(user); });
-        for (int s = 0; s < steps && code == 0; ++s) {
-            const std::string name = "w" + std::to_string(worker) + "_" + std::to_string(s / 5);
-            const std::string next = "w" + std::to_string(worker) + "_u" + std::to_string(s);
-            switch (s % 5) {
-            case 0:
-                code = UntilUnlocked([&] { return test::AddGroup(name, 70000 + worker * 1000 + s, {user, "admin"}); });
-                break;
-            case 1:
-                code = UntilUnlocked([&] { return test::CodeOf(TAVOGroupDescSet(name.c_str(), "text")); });
-                break;
-            case 2:
-                code = UntilUnlocked([&] {
-                    TLIBErrSet(ERR_SUCCESS);
-                    return test::CodeOf(UserChange(user.c_str(), next.c_str())) | TLIBErrGet();
-                });
-                user = next;
-                break;
-            case 3:
-                code = UntilUnlocked([&] { return test::SetGroup(name.c_str(), name + "r", -1, {user}); });
-                break;
-            default:
-                if (s % 2 == 0)
-                    code = UntilUnlocked([&] { return test::DeleteGroups({(name + "r").c_str()}); });
-            }
-        }
-        ::_exit(code / 0x100);
-    }
-    for (const pid_t child : children) {
-        int status = 0;
-        ::waitpid(child, &status, 0);
-        EXPECT_EQ(WIFEXITED(status) ? WEXITSTATUS(status) * 0x100 : status, 0) << "what a worker could not do";
-    }
-    std::set<std::string> groups;
-    std::set<std::string> users;
-    for (int worker = 0; worker < workers; ++worker) {
-        std::string user = "w" + std::to_string(worker) + "_u";
-        for (int s = 0; s < steps; ++s) {
-            const std::string name = "w" + std::to_string(worker) + "_" + std::to_string(s / 5);
-            if (s % 5 == 0)
-                groups.insert(name);
-            else if (s % 5 == 2)
-                user = "w" + std::to_string(worker) + "_u" + std::to_string(s);
-            else if (s % 5 == 3)
-                groups.erase(name), groups.insert(name + "r");
-            else if (s % 5 == 4 && s % 2 == 0)
-                groups.erase(name + "r");
-        }
-        users.insert(user);
-    }
-    ASSERT_TRUE(test::GetGroup("root"));
-    EXPECT_EQ(Found(test::GroupFile()), groups);
-    EXPECT_EQ(Found(test::FileText("/etc/passwd")), users);
-    // Every member still exists under that name: no rename missed a group.
-    for (const std::string &name : groups)
-        for (const std::string &member : test::Members(*test::GetGroup(name)))
-            EXPECT_TRUE(member == "admin" || users.contains(member)) << member << " in " << name;
 }
 
 }  // namespace

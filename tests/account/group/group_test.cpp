@@ -1,6 +1,7 @@
 // Groups: names, records, what is refused, what the files say, and who else hears of it.
 #include "account/group/group_fixture.h"
 #include "support/captured_log.h"
+#include "support/container_text.h"
 #include "support/fault_state.h"
 
 #include <gmock/gmock.h>
@@ -11,6 +12,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+using namespace std::string_literals;
 using test::AddGroup;
 using test::DeleteGroups;
 using test::GetGroup;
@@ -35,45 +37,22 @@ void StartWith(int current_gid, const std::string &groups = kSystemGroups, const
 
 Names Listed(const std::function<int(TLIBSZLIST **)> &list_into)
 {
-    TLIBSZLIST *list = PslTLIBSzListAlloc(512);
-    Names names;
-    const int count = list_into(&list);
-    for (int i = 0; i < list->nItem; ++i)
-        names.emplace_back(SzTLIBSzListGet(list, i));
-    TLIBSzListFree(list);
-    if (count != static_cast<int>(names.size()))
-        names.push_back("returned " + std::to_string(count));
-    return names;
+    test::List list = test::MakeList({});
+    const int count = test::Moving(list, list_into);
+    EXPECT_EQ(count, list->nItem);
+    return test::Items(list.get());
 }
 
 TEST(GroupName, Rule)
 {
-    const struct {
-        std::string name;
-        int acceptable;
-    } rows[] = {
-        {"a", 1},
-        {std::string(15, 'g'), 1},
-        {std::string(16, 'g'), 0},
-        {"", 0},
-        {"-a", 0},
-        {" a", 0},
-        {"a ", 0},
-        {"a b.c-d_e", 1},
-        {"a:b", 0},
-        {"a,b", 0},
-        {"a\nb", 0},
-        {"@a", 0},
-        {"D\\a", 0},
-        {"J\xC3\xBC", 1},
-    };
-    for (const auto &row : rows)
-        EXPECT_EQ(BlTLIBIsGroupName(row.name.c_str()), row.acceptable) << row.name;
-    std::string umlauts;
+    std::string umlauts;  // characters count, not bytes
     for (int i = 0; i < 15; ++i)
         umlauts += "\xC3\xBC";
-    EXPECT_EQ(BlTLIBIsGroupName(umlauts.c_str()), 1) << "characters count, not bytes";
-    EXPECT_EQ(BlTLIBIsGroupName((umlauts + "x").c_str()), 0);
+    for (const std::string &good : {"a"s, std::string(15, 'g'), "a b.c-d_e"s, "J\xC3\xBC"s, umlauts})
+        EXPECT_EQ(BlTLIBIsGroupName(good.c_str()), 1) << good;
+    for (const std::string &bad :
+         {std::string(16, 'g'), ""s, "-a"s, " a"s, "a "s, "a:b"s, "a,b"s, "a\nb"s, "@a"s, "D\\a"s, umlauts + "x"})
+        EXPECT_EQ(BlTLIBIsGroupName(bad.c_str()), 0) << bad;
     EXPECT_EQ(BlTLIBIsGroupName(nullptr), 0);
 }
 
@@ -322,13 +301,9 @@ TEST(GroupMembers, FollowTheUsers)
         ASSERT_EQ(test::AddUser(name), 0);
     ASSERT_EQ(AddGroup("one", -1, {"carol", "Alice", "bob"}), 0);
     ASSERT_EQ(AddGroup("two", -1, {"bob"}), 0);
-    TAVOUSER *user = nullptr;
-    ASSERT_EQ(TAVOUserAlloc(&user, "Alicia", "", -1, -1, "", "", "", -1, 0, "", 0), 0);
-    ASSERT_EQ(TAVOUserSetOne("alice", user), 0);
-    TAVOUserFree(user);
+    ASSERT_EQ(test::SetUsers({{"alice", "Alicia"}}, ""), 0);
     EXPECT_THAT(GroupFile(), HasSubstr("one:x:65537:carol,Alicia,bob\ntwo:x:65538:bob\n"));
-    const char *const names[] = {"BOB"};
-    ASSERT_EQ(TAVOUserDelete(names, 1), 0);
+    ASSERT_EQ(test::DeleteUser("BOB"), 0);
     EXPECT_THAT(GroupFile(), HasSubstr("one:x:65537:carol,Alicia\ntwo:x:65538:\n"));
 
     // Nothing to change: the file is not even touched.

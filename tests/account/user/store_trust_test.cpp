@@ -5,8 +5,10 @@
 #include "tavo_quota.h"
 #include "tavo_user.h"
 
+#include "account/group/group_fixture.h"
 #include "account/user/as_nobody.h"
 #include "account/user/user_fixture.h"
+#include "support/container_text.h"
 #include "support/planted_name.h"
 #include "support/rounds.h"
 
@@ -17,6 +19,7 @@
 #include <cstring>
 #include <functional>
 #include <set>
+#include <utility>
 
 #include <dirent.h>
 #include <fcntl.h>
@@ -106,10 +109,7 @@ TEST(StoreTrust, NeverOpensFilesThatOthersMayWrite)
         [](const char *store) { ::chmod(store, 0666); },
         [](const char *store) { ::chmod(store, 0660); },
         [](const char *store) { ::chmod(store, 04644); },
-        [](const char *store) {
-            ::unlink("/tmp/second");
-            ASSERT_EQ(::link(store, "/tmp/second"), 0);
-        },
+        [](const char *store) { ASSERT_EQ(::link(store, "/tmp/second"), 0); },
         [](const char *store) {
             if (::chown(store, test::kNobody, 0) != 0)
                 ::chmod(store, 0666);
@@ -117,6 +117,7 @@ TEST(StoreTrust, NeverOpensFilesThatOthersMayWrite)
     };
     for (const auto &fault : faults) {
         for (const std::string &store : AllStores()) {
+            ::unlink("/tmp/second");
             TouchBoth();
             fault(store.c_str());
             const int fd = ::open(store.c_str(), O_RDWR | O_CLOEXEC);
@@ -301,59 +302,50 @@ TEST(StoreTrust, AttackWhileAccountsChange)
     ExpectOurs();
 }
 
-std::string Listed(int (*list)(TLIBSZLIST **, int), int flags)
-{
-    TLIBSZLIST *names = PslTLIBSzListAlloc(1024);
-    std::string text = std::to_string(list(&names, flags)) + ":";
-    for (int i = 0; i < names->nItem; ++i)
-        text += std::string(SzTLIBSzListGet(names, i)) + ",";
-    TLIBSzListFree(names);
-    return text + "\n";
-}
-
-std::string Shown(int result, TAVOGROUP *const &group)
-{
-    if (result != 0)
-        return "0x" + std::to_string(TLIBErrGet() / 256) + "\n";
-    std::string text = std::string(group->szName) + " " + std::to_string(group->nGid);
-    for (char **member = group->rgszMember; *member; ++member)
-        text += std::string(" ") + *member;
-    TAVOGroupFree(group);
-    return text + "\n";
-}
-
 // Every look-up that takes no secret.
 std::string PublicAnswers()
 {
     std::string text;
-    for (const int flags : {int{TAVO_USER_LOCAL}, TAVO_USER_LOCAL | TAVO_USER_DOMAIN_USED, 0})
-        text += Listed(TAVOUserEnum, flags) + std::to_string(TAVOUserTotalNum(flags)) + "\n";
-    text +=
-        Listed([](TLIBSZLIST **list, int flags) { return TAVOUserEnumByPrefix(list, flags, "a"); }, TAVO_USER_LOCAL);
-    text +=
-        Listed([](TLIBSZLIST **list, int flags) { return TAVOUserEnumBySubstr(list, flags, "ö"); }, TAVO_USER_LOCAL);
-    text += std::to_string(TAVOConfGetUserLimit()) + "\n";
+    const auto say = [&](int result, const std::string &more = "") {
+        text += std::to_string(result) + " " + more + "\n";
+    };
+    const auto list = [&](const std::function<int(TLIBSZLIST **)> &into) {
+        test::List names = test::MakeList({});
+        say(test::Moving(names, into), testing::PrintToString(test::Items(names.get())));
+    };
+    const auto show = [&](int result, TAVOGROUP *found) {
+        const test::Group group(found);
+        say(result == 0 ? 0 : TLIBErrGet(),
+            result == 0 ? group->szName + std::to_string(group->nGid) + testing::PrintToString(test::Members(*group))
+                        : "");
+    };
+    for (const int flags : {int{TAVO_USER_LOCAL}, TAVO_USER_LOCAL | TAVO_USER_DOMAIN_USED, 0}) {
+        list([=](TLIBSZLIST **names) { return TAVOUserEnum(names, flags); });
+        say(TAVOUserTotalNum(flags));
+    }
+    list([](TLIBSZLIST **names) { return TAVOUserEnumByPrefix(names, TAVO_USER_LOCAL, "a"); });
+    list([](TLIBSZLIST **names) { return TAVOUserEnumBySubstr(names, TAVO_USER_LOCAL, "ö"); });
+    say(TAVOConfGetUserLimit());
     for (const char *name : {"alice", "ALICE", "ÄÖ", "äö", "toor", "nobody", "none", "admin", "guest", "a:b"})
-        text += std::to_string(TAVOUserPrivilegeGet(name)) + " ";
+        say(TAVOUserPrivilegeGet(name));
     const char *const names[] = {"alice", "none", "Root", "äö", "", "bob", "toor", "a", "b", "c", "d", "lp", nullptr};
     char valid[256] = "";
-    text += std::to_string(TAVOUserGetValidUserList(names, valid, sizeof valid)) + valid + "\n";
-    text += Listed(TAVOGroupEnum, TAVO_GROUP_LOCAL) + Listed(TAVOGroupEnum, TAVO_GROUP_DOMAIN);
-    text += std::to_string(TAVOGroupTotalNum(TAVO_GROUP_LOCAL)) + "\n";
+    say(TAVOUserGetValidUserList(names, valid, sizeof valid), valid);
+    list([](TLIBSZLIST **found) { return TAVOGroupEnum(found, TAVO_GROUP_LOCAL); });
+    list([](TLIBSZLIST **found) { return TAVOGroupEnum(found, TAVO_GROUP_DOMAIN); });
+    say(TAVOGroupTotalNum(TAVO_GROUP_LOCAL));
+    TAVOGROUP *group = nullptr;
     for (const char *name : {"staff", "STAFF", "users", "none", "root"}) {
-        TAVOGROUP *group = nullptr;
-        text += Shown(TAVOGroupGet(name, &group), group);
+        const int result = TAVOGroupGet(name, &group);
+        show(result, std::exchange(group, nullptr));
         char description[64] = "";
-        text += std::to_string(TAVOGroupDescGet(name, description, sizeof description)) + description + "\n";
-        TLIBSZLIST *members = PslTLIBSzListAlloc(1024);
-        text += std::to_string(TAVOGroupListMember(name, &members)) + "\n";
-        for (int i = 0; i < members->nItem; ++i)
-            text += std::string(SzTLIBSzListGet(members, i)) + " ";
-        TLIBSzListFree(members);
+        const int length = TAVOGroupDescGet(name, description, sizeof description);
+        say(length, description);
+        list([=](TLIBSZLIST **members) { return TAVOGroupListMember(name, members); });
     }
     for (const int gid : {0, 65536, 65537, 100, 4711}) {
-        TAVOGROUP *group = nullptr;
-        text += Shown(TAVOGroupGetByGID(gid, &group), group);
+        const int result = TAVOGroupGetByGID(gid, &group);
+        show(result, std::exchange(group, nullptr));
     }
     return text;
 }

@@ -8,10 +8,12 @@
 #include "support/text_lines.h"
 
 #include <array>
+#include <cstdio>
 #include <filesystem>
 #include <memory>
 #include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace test {
@@ -53,12 +55,16 @@ inline User GetUser(const std::string &name)
     return TAVOUserGet(name.c_str(), &user) == 0 ? User(user) : User();
 }
 
-// The code of the entry, 0 when it was applied: TAVOUserSetOne itself succeeds also when its entry is refused.
+// The code of a call that succeeds also when an entry is refused: the last refused entry's, 0 when all were applied.
+inline int CodeOfBatch(int result)
+{
+    return result == 0 || TLIBErrGet() != 0 ? TLIBErrGet() : -1;
+}
+
 inline int SetUser(const std::optional<std::string> &old_name, const TAVOUSER *user)
 {
     TLIBErrSet(ERR_SUCCESS);
-    const int result = TAVOUserSetOne(old_name ? old_name->c_str() : nullptr, user);
-    return result == 0 || TLIBErrGet() != 0 ? TLIBErrGet() : -1;
+    return CodeOfBatch(TAVOUserSetOne(old_name ? old_name->c_str() : nullptr, user));
 }
 
 inline int AddUser(const UserTexts &texts)
@@ -66,12 +72,34 @@ inline int AddUser(const UserTexts &texts)
     return SetUser(std::nullopt, MakeUser(texts).get());
 }
 
+using Changes = std::vector<std::pair<std::string, std::string>>;  // old name, empty for a new user, and name
+
+inline int SetUsers(const Changes &changes, const std::string &password)
+{
+    std::vector<User> users;
+    std::vector<const TAVOUSER *> records;
+    std::vector<const char *> old_names;
+    for (const auto &[old_name, name] : changes) {
+        users.push_back(MakeUser({.name = name, .password = password}));
+        records.push_back(users.back().get());
+        old_names.push_back(old_name.empty() ? nullptr : old_name.c_str());
+    }
+    TLIBErrSet(ERR_SUCCESS);
+    return CodeOfBatch(TAVOUserSet(old_names.data(), records.data(), static_cast<int>(records.size())));
+}
+
+inline int DeleteUsers(const std::vector<std::string> &names)
+{
+    std::vector<const char *> doomed;
+    for (const std::string &name : names)
+        doomed.push_back(name.c_str());
+    TLIBErrSet(ERR_SUCCESS);
+    return CodeOfBatch(TAVOUserDelete(doomed.data(), static_cast<int>(doomed.size())));
+}
+
 inline int DeleteUser(const std::string &name)
 {
-    TLIBErrSet(ERR_SUCCESS);
-    const char *const names[] = {name.c_str()};
-    const int result = TAVOUserDelete(names, 1);
-    return result == 0 || TLIBErrGet() != 0 ? TLIBErrGet() : -1;
+    return DeleteUsers({name});
 }
 
 inline int Rename(const std::string &old_name, const std::string &new_name)
@@ -104,6 +132,15 @@ inline std::string LineOf(const char *path, const std::string &name)
         if (line.starts_with(name + ":"))
             return line;
     return {};
+}
+
+// As Samba writes a hash.
+inline std::string Hex(const unsigned char (&hash)[16])
+{
+    char digits[33];
+    for (int i = 0; i < 16; ++i)
+        std::snprintf(digits + 2 * i, 3, "%02X", static_cast<unsigned>(hash[i]));
+    return digits;
 }
 
 }  // namespace test

@@ -3,6 +3,7 @@
 #include "tavo_group.h"
 #include "tavo_user.h"
 
+#include "account/group/group_fixture.h"
 #include "account/user/user_fixture.h"
 #include "support/captured_log.h"
 #include "support/fault_state.h"
@@ -27,8 +28,9 @@ using test::GetUser;
 
 namespace {
 
-constexpr std::array<const char *, 5> kStores{TAVO_USER_DB_NAME, TAVO_USER_DB_MISC, TAVO_USER_DB_SHADOW,
-                                              TAVO_USER_DB_SMB, TAVO_USER_DB_UID};
+constexpr std::array<const char *, 8> kStores{TAVO_USER_DB_NAME, TAVO_USER_DB_MISC, TAVO_USER_DB_SHADOW,
+                                              TAVO_USER_DB_SMB,  TAVO_USER_DB_UID,  TAVO_GROUP_DB_NAME,
+                                              TAVO_GROUP_DB_ID,  TAVO_GROUP_DB_DESC};
 
 // One call of one libc function that is to fail, as a full or broken disk makes it.
 struct Fault {
@@ -134,6 +136,9 @@ TEST(UserStore, DamageOfEveryKind)
 {
     for (int i = 0; i < 40; ++i)
         ASSERT_EQ(AddUser({.name = "user" + std::to_string(i), .password = "x", .mail = "m"}), 0);
+    const std::string groups = "#$_@GID__INDEX@_$65540$\nroot:x:0:\nstaff:x:65540:bob\n";
+    test::WriteFile("/etc/group", groups);
+    test::WriteFile("/etc/group_desc", "staff:old hands\nghost:nobody's\n");
     const auto files = AllFiles();
     const int listed = TAVOUserTotalNum(TAVO_USER_LOCAL);
     const std::string outside = "/var/outside";
@@ -141,6 +146,10 @@ TEST(UserStore, DamageOfEveryKind)
     std::mt19937 random(20240521);
     const auto pick = [&](unsigned limit) {
         return random() % limit;
+    };
+    const auto plant_link = [&](const char *path) {
+        std::filesystem::remove_all(path);
+        ASSERT_EQ(::symlink(outside.c_str(), path), 0);
     };
     const std::function<void(const char *)> damages[] = {
         [](const char *store) { ::unlink(store); },
@@ -151,61 +160,59 @@ TEST(UserStore, DamageOfEveryKind)
             ::unlink(store);
             ASSERT_EQ(::mkfifo(store, 0666), 0);
         },
-        [&](const char *store) {
-            ::unlink(store);
-            ASSERT_EQ(::symlink(outside.c_str(), store), 0);
-        },
+        plant_link,
         [](const char *store) {
             ::unlink(store);
             ASSERT_EQ(::mkdir(store, 0777), 0);
             test::WriteFile(std::string(store) + "/in", "x");
         },
-        [](const char *store) {
-            if (::chown(store, 1030, 100) != 0)  // only one user id is mapped here
-                ::unlink(store);
-        },
         [&](const char *store) {
-            std::filesystem::copy_file(kStores[pick(5)], std::string(store) + ".x"),
-                ::rename((std::string(store) + ".x").c_str(), store);
+            std::filesystem::copy_file(kStores[pick(kStores.size())], std::string(store) + ".x");
+            ::rename((std::string(store) + ".x").c_str(), store);
         },
-        [&](const char *) {
-            ::unlink("/tmp/.db.user.seal");
-            ASSERT_EQ(::symlink(outside.c_str(), "/tmp/.db.user.seal"), 0);
-        },
+        [&](const char *) { plant_link("/tmp/.db.user.seal"); },
         [](const char *) {
             std::filesystem::remove_all("/tmp/.db.user.tmp");
             ASSERT_EQ(::mkfifo("/tmp/.db.user.tmp", 0666), 0);
             ::unlink("/tmp/.db.user.seal");
         },
         [&](const char *) {
-            std::filesystem::remove_all("/tmp/.db.user.tmp");
-            ASSERT_EQ(::symlink("/var", "/tmp/.db.user.tmp"), 0);
+            plant_link("/tmp/.db.user.tmp");
             ::unlink("/tmp/.db.user.seal");
         },
     };
     testing::internal::CaptureStderr();
     for (int round = 0; round < test::Rounds(2000); ++round) {
-        const size_t kind = round < 60 ? size_t(round / 5) : pick(std::size(damages));
-        const char *store = kStores[round < 60 ? size_t(round % 5) : pick(5)];
+        // Every kind with every store, with one look-up or change after the other.
+        const size_t kind = size_t(round) % std::size(damages);
+        const char *store = kStores[size_t(round) % kStores.size()];
+        SCOPED_TRACE(std::to_string(kind) + " " + store);
         damages[kind](store);
-        if (round % 3 == 0) {
-            ASSERT_TRUE(GetUser("USER17")) << kind << " " << store << " " << std::hex << TLIBErrGet();
-            ASSERT_EQ(TAVOUserTotalNum(TAVO_USER_LOCAL), listed) << kind << " " << store;
-        } else if (round % 3 == 1) {
-            ASSERT_EQ(AddUser({.name = "new"}), 0) << kind << " " << store;
+        char text[16];
+        switch (round / 11 % 3) {
+        case 0:
+            ASSERT_TRUE(GetUser("USER17")) << std::hex << TLIBErrGet();
+            ASSERT_EQ(TAVOUserTotalNum(TAVO_USER_LOCAL), listed);
+            break;
+        case 1:
+            ASSERT_EQ(test::SetGroup("staff", "staff", -1, {"bob"}), 0);
+            ASSERT_EQ(AddUser({.name = "new"}), 0);
             ASSERT_EQ(test::DeleteUser("new"), 0);
-            ASSERT_EQ(test::Lines(test::FileText("/etc/passwd")).size(), test::Lines(files[0]).size())
-                << kind << " " << store;
-        } else {
-            ASSERT_STREQ(GetUser("user3")->szMail, "m") << kind << " " << store;
+            ASSERT_EQ(test::Lines(test::FileText("/etc/passwd")).size(), test::Lines(files[0]).size());
+            break;
+        default:
+            ASSERT_STREQ(GetUser("user3")->szMail, "m");
         }
+        ASSERT_EQ(TAVOGroupDescGet("staff", text, sizeof text), 10);
+        ASSERT_STREQ(text, "old hands");
         struct stat st;
-        ASSERT_TRUE(::lstat(store, &st) == 0 && S_ISREG(st.st_mode) && st.st_uid == 0) << kind;
+        ASSERT_TRUE(::lstat(store, &st) == 0 && S_ISREG(st.st_mode) && st.st_uid == 0);
     }
     EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
     EXPECT_EQ(AllFiles()[0], files[0]);
     EXPECT_EQ(AllFiles()[1], files[1]);
     EXPECT_EQ(AllFiles()[3], files[3]);
+    EXPECT_EQ(test::GroupFile() + test::DescFile(), groups + "staff:old hands\n");
     EXPECT_EQ(test::ReadFile(outside), "precious\n");
 }
 
@@ -396,23 +403,16 @@ TEST(UserStore, EmptyStart)
     ASSERT_EQ(std::filesystem::remove_all("/usr/tavo/etc/private"), 1u);
     ASSERT_EQ(AddUser({.name = "first"}), 0);
     EXPECT_EQ(test::FileText("/etc/passwd"), "first:x:1024:100::/var/services/homes/first:/bin/csh\n");
-    const struct {
-        const char *path;
-        unsigned mode;
-    } rows[] = {{"/etc/passwd", 0644},
-                {"/etc/shadow", 0600},
-                {"/etc/tavouser.conf", 0644},
-                {"/usr/tavo/etc/private/smbpasswd", 0600}};
-    for (const auto &row : rows) {
-        struct stat st;
-        ASSERT_EQ(::stat(row.path, &st), 0);
-        EXPECT_EQ(st.st_mode & 07777, row.mode) << row.path;
+    struct stat st;
+    constexpr unsigned modes[] = {0644, 0600, 0644, 0600};
+    for (size_t i = 0; i < std::size(modes); ++i) {
+        ASSERT_EQ(::stat(test::kAccountFiles[i], &st), 0);
+        EXPECT_EQ(st.st_mode & 07777, modes[i]) << test::kAccountFiles[i];
     }
     ASSERT_EQ(::chmod("/etc/shadow", 0640), 0);
     if (::chown("/etc/shadow", 0, 42) != 0)
         GTEST_SKIP() << "only one user id is mapped here";
     ASSERT_EQ(AddUser({.name = "second"}), 0);
-    struct stat st;
     ASSERT_EQ(::stat("/etc/shadow", &st), 0);
     EXPECT_EQ(st.st_mode & 07777, 0640u);
     EXPECT_EQ(st.st_gid, 42u);
@@ -438,8 +438,7 @@ TEST(UserStore, DumpNeverLosesAnAccount)
     EXPECT_EQ(TAVOBDbDelete(db.pName, "ALICE", 6), 0);
     close(db);
     db = open();
-    EXPECT_EQ(TAVOUserDBDump(&db), -1);
-    EXPECT_EQ(test::LastFault(), (test::Fault{ERR_WRITE_FAILED, "user_db_dump"}));
+    EXPECT_EQ(test::FaultOf(TAVOUserDBDump(&db)), (test::Fault{ERR_WRITE_FAILED, "user_db_dump"}));
     EXPECT_EQ(AllFiles(), before);
     EXPECT_EQ(TAVOBDbDelete(db.pName, "BOB", 4), 0);
     EXPECT_EQ(TAVOBDbSet(db.pName, "ALICE", 6, "alice:x:1027:100::/:/bin/csh", 29), 0);
@@ -448,8 +447,7 @@ TEST(UserStore, DumpNeverLosesAnAccount)
     EXPECT_EQ(test::LineOf("/etc/passwd", "alice"), "alice:x:1027:100::/:/bin/csh");
     const test::User carol = test::MakeUser({.name = "carol", .uid = 1200, .gid = 100});
     EXPECT_EQ(TAVOUserDBSet(&db, "ALICE", carol.get()), 0);
-    EXPECT_EQ(TAVOUserDBSet(&db, nullptr, carol.get()), -1);
-    EXPECT_EQ(test::LastFault(), (test::Fault{ERR_USER_EXISTS, "user_db_set"}));
+    EXPECT_EQ(test::FaultOf(TAVOUserDBSet(&db, nullptr, carol.get())), (test::Fault{ERR_USER_EXISTS, "user_db_set"}));
     EXPECT_EQ(TAVOUserDBDump(&db), 0);
     EXPECT_EQ(TAVOUserDBGetFreeUid(&db), 1029);
     close(db);
@@ -475,14 +473,11 @@ TEST(UserStore, DisksThatFail)
         const auto before = AllFiles();
         int failed = 0;
         for (int call = 1;; ++call) {
-            const test::User user = test::MakeUser({.name = "bob", .password = "y"});
-            const TAVOUSER *record = user.get();
-            const char *none = nullptr;
             fault = {row.function, call, row.reason};
-            const int result = TAVOUserSet(&none, &record, 1);
+            const int code = AddUser({.name = "bob", .password = "y"});
             const bool hit = fault.countdown <= 0;
             fault = {};
-            if (!hit || result == 0)
+            if (!hit || code == 0)
                 break;  // beyond the last one, or one that does not matter any more
             ++failed;
             EXPECT_EQ(test::LastFault(), (test::Fault{row.code, "user_db_dump"})) << row.function << " " << call;
@@ -536,35 +531,19 @@ TEST(UserStore, SyncsOfABatch)
     for (int i = 0; i < 300; ++i)
         names.push_back("user" + std::to_string(i));
     const auto set = [&](bool add, const std::string &suffix) {
-        std::vector<test::User> users;
-        std::vector<const TAVOUSER *> records;
-        std::vector<const char *> old_names;
-        for (const std::string &name : names) {
-            users.push_back(test::MakeUser({.name = name + suffix, .password = "$1$ab$cd"}));
-            records.push_back(users.back().get());
-            old_names.push_back(add ? nullptr : name.c_str());
-        }
-        return TAVOUserSet(old_names.data(), records.data(), static_cast<int>(records.size()));
+        test::Changes changes;
+        for (const std::string &name : names)
+            changes.emplace_back(add ? "" : name, name + suffix);
+        return test::SetUsers(changes, "$1$ab$cd");
     };
     const auto remove = [&](const std::string &suffix) {
-        std::vector<std::string> full;
-        std::vector<const char *> doomed;
+        std::vector<std::string> doomed;
         for (const std::string &name : names)
-            full.push_back(name + suffix);
-        for (const std::string &name : full)
-            doomed.push_back(name.c_str());
-        return TAVOUserDelete(doomed.data(), static_cast<int>(doomed.size()));
+            doomed.push_back(name + suffix);
+        return test::DeleteUsers(doomed);
     };
     const auto join = [&] {
-        std::vector<const char *> members;
-        for (const std::string &name : names)
-            members.push_back(name.c_str());
-        members.push_back(nullptr);
-        TAVOGROUP group = {};
-        group.szName = const_cast<char *>("staff");
-        group.nGid = -1;
-        group.rgszMember = const_cast<char **>(members.data());
-        return TAVOGroupSet(nullptr, &group);
+        return test::AddGroup("staff", -1, names);
     };
     const struct {
         const char *what;
@@ -577,7 +556,7 @@ TEST(UserStore, SyncsOfABatch)
         {"rename, also in the group", [&] { return set(false, "r"); }, 11},
         {"delete, also from the group", [&] { return remove("r"); }, 11},
         {"add again", [&] { return set(true, ""); }, 9},
-        {"the group again", [&] { return TAVOGroupDelete(std::array{"staff"}.data(), 1) + join(); }, 4},
+        {"the group again", [&] { return test::DeleteGroups({"staff"}) + join(); }, 4},
         {"rename everywhere", [&] { return NameThemEverywhere(names), set(false, "r"); }, 19},
         {"delete everywhere", [&] { return remove("r"); }, 17},
     };

@@ -1,7 +1,9 @@
 // Sixteen programs change accounts at once, each now through the library and now with the system's own useradd,
 // usermod, passwd and userdel. Every change that one of them saw succeed has happened, and stays.
+#include "tavo_group.h"
 #include "tavo_user.h"
 
+#include "account/group/group_fixture.h"
 #include "account/user/user_fixture.h"
 #include "support/machine.h"
 #include "support/rounds.h"
@@ -23,10 +25,11 @@ using test::GetUser;
 namespace {
 
 constexpr int kWorkers = 16;
-constexpr int kSteps = 8;      // of a cycle, one operation each
-constexpr int kCycles = 40;    // 16 x 40 x 8: 5,120 operations
+constexpr int kSteps = 12;     // of a cycle, one operation each
+constexpr int kCycles = 30;    // 16 x 30 x 12: 5,760 operations
 constexpr int kPatience = 20;  // how often a program tries again when another one holds the lock
 
+const std::string kBusy = "locked all the time";
 constexpr char kAddedHash[] = "$1$ab$cdefghijklmnopqrstuv./";
 
 // In memory that all of them share.
@@ -80,25 +83,29 @@ class Worker {
         return kind + std::to_string(worker) + "_" + std::to_string(cycle);
     }
 
-    // An account that the library adds and the tools change, and one the other way round.
+    // An account that the library adds and the tools change, and one the other way round; and a group of the first.
     bool Cycle(int cycle)
     {
         const std::string ours = Ours(number_, cycle);
         const std::string theirs = Theirs(number_, cycle);
         const std::string kept = ours + "r";
         const std::string password = "Pw-" + ours;
-        return Library("add", ours, [&] { return test::AddUser({.name = ours, .password = "first"}); }) &&
+        return Library("add " + ours, [&] { return test::AddUser({.name = ours, .password = "first"}); }) &&
+               Library("group " + ours, [&] { return test::AddGroup(ours, -1, {ours}); }) &&
                Tool("printf '" + password + "\\n" + password + "\\n' | /usr/bin/passwd " + ours) &&
                Holds(ours, [&](const TAVOUSER &user) { return IsPassword(password, user.szPasswd); }) &&
-               Library("rename", ours, [&] { return test::Rename(ours, kept); }) &&
+               Library("describe " + ours, [&] { return test::CodeOf(TAVOGroupDescSet(ours.c_str(), "text")); }) &&
+               Library("rename " + ours, [&] { return test::Rename(ours, kept); }) &&
                Holds(kept, [&](const TAVOUSER &user) { return IsPassword(password, user.szPasswd); }) &&
                Tool("/usr/sbin/useradd -M -N -g 100 -p '" + std::string(kAddedHash) + "' " + theirs) &&
                Holds(theirs, [&](const TAVOUSER &user) { return std::string(kAddedHash) == user.szPasswd; }) &&
-               Library("rename", theirs, [&] { return test::Rename(theirs, theirs + "r"); }) &&
+               Library("rename " + theirs, [&] { return test::Rename(theirs, theirs + "r"); }) &&
+               Library("regroup " + kept, [&] { return test::SetGroup(ours.c_str(), kept, -1, {kept}); }) &&
                Tool("/usr/sbin/usermod -c 'by usermod' " + kept) &&
-               Library("change", kept, [&] { return SetMail(kept); }) &&
-               (cycle % 2 == 0 ? Library("delete", theirs, [&] { return test::DeleteUser(theirs + "r"); })
-                               : Tool("/usr/sbin/userdel " + theirs + "r"));
+               Library("change " + kept, [&] { return SetMail(kept); }) &&
+               (cycle % 2 == 0 ? Library("delete " + theirs, [&] { return test::DeleteUser(theirs + "r"); }) &&
+                                     Library("ungroup " + kept, [&] { return test::DeleteGroups({kept.c_str()}); })
+                               : Tool("/usr/sbin/userdel " + theirs + "r") && Count());
     }
 
     // As any program changes one thing of an account: it reads the record and stores it again.
@@ -112,59 +119,55 @@ class Worker {
         return test::SetUser(name, &changed);
     }
 
-    bool Library(const char *what, const std::string &name, const std::function<int()> &change)
+    // Tries again while another program holds the lock. An attempt returns what went wrong.
+    bool Retry(const std::string &what, const std::function<std::string()> &attempt)
     {
-        for (int tries = 0; tries < kPatience; ++tries) {
+        std::string wrong = kBusy;
+        for (int tries = 0; tries < kPatience && wrong == kBusy; ++tries) {
             TLIBErrSet(ERR_SUCCESS);
-            const int code = change();
-            if (code == 0)
-                return Count();
-            if (code != ERR_LOCK_FAILED)
-                return Complain(std::string(what) + " " + name + ": code " + std::to_string(code));
-            ++score_.busy;
+            wrong = attempt();
+            score_.busy += wrong == kBusy;
         }
-        return Complain(std::string(what) + " " + name + ": locked all the time");
+        if (!wrong.empty())
+            std::fprintf(stderr, "worker %d: %s: %s\n", number_, what.c_str(), wrong.c_str());
+        return wrong.empty();
+    }
+
+    static std::string Wrong(int code)
+    {
+        return code == 0 ? "" : code == ERR_LOCK_FAILED ? kBusy : "code " + std::to_string(code);
+    }
+
+    bool Library(const std::string &what, const std::function<int()> &change)
+    {
+        return Retry(what, [&] { return Wrong(change()); }) && Count();
     }
 
     bool Tool(const std::string &command)
     {
-        test::CommandResult result = {};
-        for (int tries = 0; tries < kPatience; ++tries) {
-            result = test::Shell(command);
-            if (result.status == 0)
-                return Count();
-            if (result.output.find("try again later") == std::string::npos &&
-                result.output.find("lock busy") == std::string::npos)
-                break;
-            ++score_.busy;
-        }
-        return Complain(command + ": status " + std::to_string(result.status) + "\n" + result.output);
+        const auto attempt = [&] {
+            const test::CommandResult result = test::Shell(command);
+            const bool busy = result.output.find("try again later") != result.output.npos ||
+                              result.output.find("lock busy") != result.output.npos;
+            return result.status == 0 ? "" : busy ? kBusy : std::to_string(result.status) + "\n" + result.output;
+        };
+        return Retry(command, attempt) && Count();
     }
 
     bool Holds(const std::string &name, const std::function<bool(const TAVOUSER &)> &expected)
     {
-        for (int tries = 0; tries < kPatience; ++tries) {
-            TLIBErrSet(ERR_SUCCESS);
+        return Retry(name, [&] {
             const test::User user = GetUser(name);
-            if (user)
-                return expected(*user) ||
-                       Complain(name + " is not what it was just made: " + user->szPasswd + " " + user->szDesc);
-            if (TLIBErrGet() != ERR_LOCK_FAILED)
-                break;
-        }
-        return Complain(name + " cannot be read: code " + std::to_string(TLIBErrGet()));
+            return !user             ? Wrong(TLIBErrGet())
+                   : expected(*user) ? ""
+                                     : "not what it was just made: " + std::string(user->szPasswd) + " " + user->szDesc;
+        });
     }
 
     bool Count()
     {
         ++score_.operations;
         return true;
-    }
-
-    bool Complain(const std::string &text) const
-    {
-        std::fprintf(stderr, "worker %d: %s\n", number_, text.c_str());
-        return false;
     }
 
     const int number_;
@@ -229,6 +232,14 @@ TEST(UserStorm, WorkersAndTheSystemsTools)
         CheckKept(name, account->second);
     }
     EXPECT_EQ(found, expected);
+    std::map<std::string, std::string> groups;  // by their ids
+    for (const std::string &line : test::Lines(test::GroupFile()))
+        if (const std::string name = Field(line, 0); name.starts_with('w')) {
+            EXPECT_TRUE(groups.emplace(Field(line, 2), name).second) << "one group id for two: " << line;
+            EXPECT_EQ(Field(line, 3), name) << "the member was renamed with its groups";
+            EXPECT_NE(("\n" + test::DescFile()).find("\n" + name + ":text\n"), std::string::npos) << name;
+        }
+    EXPECT_EQ(int(groups.size()), kWorkers * (cycles / 2)) << "those of every other cycle";
     for (const char *path : test::kAccountFiles)
         EXPECT_EQ(test::FileText(path).find("\nt"), std::string::npos) << "a deleted account in " << path;
 }

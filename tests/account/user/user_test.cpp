@@ -5,6 +5,7 @@
 
 #include "account/user/user_fixture.h"
 #include "support/captured_log.h"
+#include "support/container_text.h"
 #include "support/fault_state.h"
 #include "support/scenario.h"
 
@@ -23,56 +24,23 @@ using namespace std::string_literals;
 using test::AddUser;
 using test::AllFiles;
 using test::Fault;
+using test::FaultOf;
 using test::GetUser;
-using test::LastFault;
 using test::LineOf;
 using test::MakeUser;
 
 namespace {
 
-std::vector<std::string> Names(const TLIBSZLIST *list)
-{
-    std::vector<std::string> names;
-    for (int i = 0; i < list->nItem; ++i)
-        names.emplace_back(SzTLIBSzListGet(list, i));
-    return names;
-}
-
 TEST(UserName, Rule)
 {
-    const std::string sixty_four = [] {
-        std::string text;
-        for (int i = 0; i < 64; ++i)
-            text += "\xE2\x82\xAC";
-        return text;
-    }();
-    const struct {
-        std::string name;
-        int good;
-    } rows[] = {
-        {"a", 1},
-        {"A.b-c_d 9", 1},
-        {sixty_four, 1},
-        {sixty_four + "a", 0},
-        {std::string(64, 'a'), 1},
-        {std::string(65, 'a'), 0},
-        {"", 0},
-        {"-a", 0},
-        {" a", 0},
-        {"a ", 0},
-        {"a:b", 0},
-        {"a\\b", 0},
-        {"a\nb", 0},
-        {"a,b", 0},
-        {"a/b", 0},
-        {"a\x7F", 0},
-        {"..", 1},
-        {"a\xC3\xA9", 1},
-        {"a@b", 0},
-        {"1000", 1},
-    };
-    for (const auto &row : rows)
-        EXPECT_EQ(BlTLIBIsUserName(row.name.c_str()), row.good) << row.name;
+    std::string sixty_four;
+    for (int i = 0; i < 64; ++i)
+        sixty_four += "\xE2\x82\xAC";
+    for (const std::string &good : {"a"s, "A.b-c_d 9"s, sixty_four, std::string(64, 'a'), ".."s, "a\xC3\xA9"s, "1000"s})
+        EXPECT_EQ(BlTLIBIsUserName(good.c_str()), 1) << good;
+    for (const std::string &bad : {sixty_four + "a", std::string(65, 'a'), ""s, "-a"s, " a"s, "a "s, "a:b"s, "a\\b"s,
+                                   "a\nb"s, "a,b"s, "a/b"s, "a\x7F"s, "a@b"s})
+        EXPECT_EQ(BlTLIBIsUserName(bad.c_str()), 0) << bad;
     EXPECT_EQ(BlTLIBIsUserName(nullptr), 0);
 }
 
@@ -96,8 +64,8 @@ TEST(UserRecord, HoldsEveryFieldAndRefillsFromItself)
     EXPECT_EQ(user->nKind, TAVO_USER_KIND_DOMAIN);
     EXPECT_EQ(user->fCannotChgPasswd, 1);
     EXPECT_STREQ(user->szMail, "");
-    EXPECT_EQ(TAVOUserAlloc(&user, "", "p", 1, 2, "d", "h", "s", 3, 4, "m", 5), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_alloc"}));
+    EXPECT_EQ(FaultOf(TAVOUserAlloc(&user, "", "p", 1, 2, "d", "h", "s", 3, 4, "m", 5)),
+              (Fault{ERR_BAD_PARAMETERS, "user_alloc"}));
     EXPECT_STREQ(user->szName, "DOM\\u") << "a refused refill leaves the record";
     TAVOUserFree(user);
     TAVOUserFree(nullptr);
@@ -156,14 +124,11 @@ TEST(UserSet, RefusalsLeaveTheFiles)
 
     const TAVOUSER *users[] = {nullptr};
     const char *names[] = {nullptr};
-    EXPECT_EQ(TAVOUserSet(nullptr, users, 1), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_set"}));
+    EXPECT_EQ(FaultOf(TAVOUserSet(nullptr, users, 1)), (Fault{ERR_BAD_PARAMETERS, "user_set"}));
     EXPECT_EQ(TAVOUserSet(names, users, -1), -1);
     EXPECT_EQ(TAVOUserSet(nullptr, nullptr, 0), 0);
-    EXPECT_EQ(TAVOUserSetOne("alice", nullptr), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_set_one"}));
-    EXPECT_EQ(TAVOUserDelete(nullptr, 1), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_delete"}));
+    EXPECT_EQ(FaultOf(TAVOUserSetOne("alice", nullptr)), (Fault{ERR_BAD_PARAMETERS, "user_set_one"}));
+    EXPECT_EQ(FaultOf(TAVOUserDelete(nullptr, 1)), (Fault{ERR_BAD_PARAMETERS, "user_delete"}));
     EXPECT_EQ(AllFiles(), before);
 }
 
@@ -183,17 +148,16 @@ TEST(UserSet, BatchSkipsWhatFails)
     EXPECT_FALSE(GetUser("guest"));
     EXPECT_EQ(LineOf("/etc/passwd", "four"), "four:x:1025:100::/var/services/homes/four:/bin/csh");
 
-    std::vector<std::string> notices;
-    for (const test::LoggedLine &line : log.Lines())
-        if (line.priority == LOG_NOTICE)
-            notices.push_back(line.text.substr(line.text.find(' ') + 1));
-    EXPECT_EQ(notices, (std::vector<std::string>{"Failed to set user [two:], tavoerr=0x1A00",
-                                                 "Failed to set user [one], tavoerr=0x1C00",
-                                                 "Failed to set user [four], tavoerr=0x2100"}));
+    std::string notices;
     const auto says = [&](const std::string &text) {
         return std::any_of(log.Lines().begin(), log.Lines().end(),
                            [&](const test::LoggedLine &line) { return line.text.ends_with(text); });
     };
+    for (const test::LoggedLine &line : log.Lines())
+        if (line.priority == LOG_NOTICE)
+            notices += line.text.substr(line.text.find(' ') + 1) + "\n";
+    EXPECT_EQ(notices, "Failed to set user [two:], tavoerr=0x1A00\nFailed to set user [one], tavoerr=0x1C00\n"
+                       "Failed to set user [four], tavoerr=0x2100\n");
     EXPECT_TRUE(says(" Duplicated key:[GUEST]"));
     EXPECT_EQ(test::SetUser("ghost", renamed.get()), ERR_NO_SUCH_USER);
     EXPECT_TRUE(says(" szOldName=[ghost] is NOT EXIST."));
@@ -219,16 +183,10 @@ TEST(UserSet, UidsOfTheRange)
     EXPECT_EQ(GetUser("c")->nUid, 3071) << "a counter that a program stored is not lost";
 
     // All 2,049 ids: five are taken, the sixth of the last batch finds none.
-    std::vector<test::User> users;
-    std::vector<const TAVOUSER *> records;
-    for (int i = 0; i < 2049 - 5; ++i) {
-        users.push_back(MakeUser({.name = "u" + std::to_string(i)}));
-        records.push_back(users.back().get());
-    }
-    std::vector<const char *> none(records.size());
-    TLIBErrSet(ERR_SUCCESS);
-    ASSERT_EQ(TAVOUserSet(none.data(), records.data(), int(records.size())), 0);
-    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
+    test::Changes added;
+    for (int i = 0; i < 2049 - 5; ++i)
+        added.emplace_back("", "u" + std::to_string(i));
+    ASSERT_EQ(test::SetUsers(added, ""), 0);
     EXPECT_EQ(AddUser({.name = "full"}), ERR_TOO_MANY_USERS);
     EXPECT_EQ(test::Lines(test::FileText("/etc/passwd")).size(), 2049u + 7);
     EXPECT_EQ(test::DeleteUser("u1000"), 0);
@@ -263,16 +221,15 @@ TEST(UserEnum, ListsByFlagAndText)
     for (const auto &row : rows) {
         TLIBSzListRemoveAll(list);
         EXPECT_EQ(row.list(), int(row.names.size()));
-        EXPECT_EQ(Names(list), row.names);
+        EXPECT_EQ(test::Items(list), row.names);
     }
     test::WriteFile("/usr/tavo/etc/duser_used", "DOM\\joe\nnot one\nDOM\\ann\n");
     TLIBSzListRemoveAll(list);
     EXPECT_EQ(TAVOUserEnum(&list, TAVO_USER_LOCAL | TAVO_USER_DOMAIN_USED), 8);
-    EXPECT_EQ(Names(list)[0], "DOM\\joe") << "those in use come first";
+    EXPECT_EQ(test::Items(list)[0], "DOM\\joe") << "those in use come first";
     EXPECT_EQ(TAVOUserTotalNum(1), 6);
     for (const int flags : {0, 8}) {
-        EXPECT_EQ(TAVOUserEnum(&list, flags), -1);
-        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_enum"}));
+        EXPECT_EQ(FaultOf(TAVOUserEnum(&list, flags)), (Fault{ERR_BAD_PARAMETERS, "user_enum"}));
     }
     EXPECT_EQ(TAVOUserEnumByPrefix(&list, 1, nullptr), -1);
     TLIBSzListFree(list);
@@ -280,21 +237,19 @@ TEST(UserEnum, ListsByFlagAndText)
     const char *const members[] = {"BOB", "ghost", "", "Zoe", nullptr};
     char text[8];
     EXPECT_EQ(TAVOUserGetValidUserList(members, nullptr, 0), 8);
-    EXPECT_EQ(TAVOUserGetValidUserList(members, text, 7), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_NOT_ENOUGH_MEMORY, "user_get_valid_user_list"}));
+    EXPECT_EQ(FaultOf(TAVOUserGetValidUserList(members, text, 7)),
+              (Fault{ERR_NOT_ENOUGH_MEMORY, "user_get_valid_user_list"}));
     EXPECT_EQ(TAVOUserGetValidUserList(members, text, 8), 8);
     EXPECT_STREQ(text, "BOB,Zoe");
 
     EXPECT_EQ(TAVOUserPrivilegeGet("ADMIN"), 0x3F);
     EXPECT_EQ(TAVOUserPrivilegeGet("Guest"), 0);
-    EXPECT_EQ(TAVOUserPrivilegeGet("DOM\\joe"), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_NO_SUCH_USER, "user_privilege_get"}));
+    EXPECT_EQ(FaultOf(TAVOUserPrivilegeGet("DOM\\joe")), (Fault{ERR_NO_SUCH_USER, "user_privilege_get"}));
 
     TAVOUSER *user = nullptr;
     EXPECT_EQ(TAVOUserGetByUID(900, &user), 0);
     EXPECT_STREQ(user->szName, "service");
-    EXPECT_EQ(TAVOUserGetByUID(901, &user), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_NO_SUCH_USER, "user_get_by_uid"}));
+    EXPECT_EQ(FaultOf(TAVOUserGetByUID(901, &user)), (Fault{ERR_NO_SUCH_USER, "user_get_by_uid"}));
     EXPECT_STREQ(user->szName, "service") << "a failure leaves the record";
     TAVOUserFree(user);
 }
@@ -346,12 +301,14 @@ TEST(UserExpiry, DatesAndDays)
     }
     user->nExpired = 5;
     for (const char *bad : {"", "yesterday", "2023-11-05", "2023/13/01", "2023/02/30", "2023/11/05x"}) {
-        EXPECT_EQ(TAVOUserExpiredDateFill(user.get(), bad), -1) << bad;
-        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_expired_date_fill"}));
+        EXPECT_EQ(FaultOf(TAVOUserExpiredDateFill(user.get(), bad)),
+                  (Fault{ERR_BAD_PARAMETERS, "user_expired_date_fill"}))
+            << bad;
         EXPECT_EQ(user->nExpired, 5);
     }
-    EXPECT_EQ(TAVOUserExpiredDateGet(user.get(), text, 8), -1) << "1970/1/6 has eight characters";
-    EXPECT_EQ(LastFault(), (Fault{ERR_NOT_ENOUGH_MEMORY, "user_expired_date_get"}));
+    EXPECT_EQ(FaultOf(TAVOUserExpiredDateGet(user.get(), text, 8)),
+              (Fault{ERR_NOT_ENOUGH_MEMORY, "user_expired_date_get"}))
+        << "1970/1/6 has eight characters";
 
     EXPECT_EQ(AddUser({.name = "gone", .expire = 1000}), 0);
     EXPECT_EQ(AddUser({.name = "stays", .expire = -1}), 0);
@@ -372,25 +329,15 @@ TEST(SambaHashes, KnownPasswords)
         {"password", "E52CAC67419A9A224A3B108F3FA6CB6D", "8846F7EAEE8FB117AD06BDD830B7586C"},
         {"SecREt01", "FF3750BCC2B22412C2265B23734E0DAC", "CD06CA7C7E10C99B1D33B7485A2ED808"},
     };
-    const auto hex = [](const unsigned char *hash) {
-        std::string text;
-        char digits[3];
-        for (int i = 0; i < 16; ++i) {
-            std::snprintf(digits, sizeof digits, "%02X", hash[i]);
-            text += digits;
-        }
-        return text;
-    };
     unsigned char hash[16];
     for (const auto &row : rows) {
         EXPECT_EQ(TLIBSmbLmHash(row.password, hash), 0);
-        EXPECT_EQ(hex(hash), row.lm) << row.password;
+        EXPECT_EQ(test::Hex(hash), row.lm) << row.password;
         EXPECT_EQ(TLIBSmbMd4Hash(row.password, hash), 0);
-        EXPECT_EQ(hex(hash), row.nt) << row.password;
+        EXPECT_EQ(test::Hex(hash), row.nt) << row.password;
     }
     EXPECT_EQ(TLIBSmbLmHash(nullptr, hash), -1);
-    EXPECT_EQ(TLIBSmbMd4Hash("x", nullptr), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "smb_md4_hash"}));
+    EXPECT_EQ(FaultOf(TLIBSmbMd4Hash("x", nullptr)), (Fault{ERR_BAD_PARAMETERS, "smb_md4_hash"}));
     std::string salts;
     for (int i = 0; i < 64; ++i)
         salts += TAVOUserRandomNumMap2Seed(-i - 64);
@@ -470,58 +417,25 @@ TEST(UserLock, RefusalsAndTheWayBack)
     const std::string open_samba = LineOf("/usr/tavo/etc/private/smbpasswd", "alice");
     const auto before = AllFiles();
     const struct {
-        int code;
+        const char *name;
         std::function<int()> call;
-    } refusals[] = {
-        {ERR_BAD_PARAMETERS,
-         [] {
-             return TAVOUserLockSet(nullptr, 1);
-         }},
-        {ERR_NO_SUCH_USER,
-         [] {
-             return TAVOUserLockSet("ghost", 1);
-         }},
-        {ERR_NO_SUCH_USER,
-         [] {
-             return TAVOUserLockSet("DOM\\alice", 1);
-         }},
-        {ERR_BAD_PARAMETERS,
-         [] {
-             return TAVOUserLockSet("admin", 0);
-         }},  // "*" is not a hash
-        {ERR_NO_SUCH_USER,
-         [] {
-             return TAVOUserAgingSet("ghost", 0, 1, 1);
-         }},
-        {ERR_BAD_PARAMETERS,
-         [] {
-             return TAVOUserAgingSet("alice", 0, 100000, 1);
-         }},
-        {ERR_BAD_PARAMETERS,
-         [] {
-             return TAVOUserAgingSet("alice", -2, 90, 1);
-         }},
-        {ERR_BAD_PARAMETERS,
-         [] {
-             return TAVOUserAgingSet("alice", 90, 90, -1);
-         }},  // would fix the password
-        {ERR_BAD_PARAMETERS,
-         [] {
-             return TAVOUserAgingSet("alice", 99999, -1, -1);
-         }},
-        {ERR_BAD_PARAMETERS,
-         [] {
-             return TAVOUserAgingSet("fixed", 1, -1, -1);
-         }},  // would free it
-        {ERR_BAD_PARAMETERS,
-         [] {
-             return TAVOUserAgingSet("fixed", -1, 90, -1);
-         }},
+        int code;
+    } rows[] = {
+        {"no name", [] { return TAVOUserLockSet(nullptr, 1); }, ERR_BAD_PARAMETERS},
+        {"no user", [] { return TAVOUserLockSet("ghost", 1); }, ERR_NO_SUCH_USER},
+        {"a domain's user", [] { return TAVOUserLockSet("DOM\\alice", 1); }, ERR_NO_SUCH_USER},
+        {"'*' is not a hash", [] { return TAVOUserLockSet("admin", 0); }, ERR_BAD_PARAMETERS},
+        {"ages of no user", [] { return TAVOUserAgingSet("ghost", 0, 1, 1); }, ERR_NO_SUCH_USER},
+        {"too long", [] { return TAVOUserAgingSet("alice", 0, 100000, 1); }, ERR_BAD_PARAMETERS},
+        {"too short", [] { return TAVOUserAgingSet("alice", -2, 90, 1); }, ERR_BAD_PARAMETERS},
+        {"would fix the password", [] { return TAVOUserAgingSet("alice", 90, 90, -1); }, ERR_BAD_PARAMETERS},
+        {"beyond what is kept", [] { return TAVOUserAgingSet("alice", 99999, -1, -1); }, ERR_BAD_PARAMETERS},
+        {"would free it", [] { return TAVOUserAgingSet("fixed", 1, -1, -1); }, ERR_BAD_PARAMETERS},
+        {"of a fixed one", [] { return TAVOUserAgingSet("fixed", -1, 90, -1); }, ERR_BAD_PARAMETERS},
     };
-    for (const auto &refusal : refusals) {
+    for (const auto &row : rows) {
         TLIBErrSet(ERR_SUCCESS);
-        EXPECT_EQ(refusal.call(), -1) << &refusal - refusals;
-        EXPECT_EQ(TLIBErrGet(), refusal.code) << &refusal - refusals;
+        EXPECT_EQ(FaultOf(row.call()).code, row.code) << row.name;
     }
     EXPECT_EQ(AllFiles(), before);
 
@@ -623,8 +537,8 @@ TEST(UserSetPasswd, StoresOnlyWhatIsAHash)
     EXPECT_EQ(AllFiles(), before);
     EXPECT_EQ(set(alice.get(), "$1$a", hex.c_str(), hex.c_str()), ERR_SUCCESS);
     EXPECT_STREQ(GetUser("alice")->szPasswd, "$1$a");
-    EXPECT_EQ(TAVOUserSetPasswd(nullptr, nullptr, nullptr, nullptr, 1), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "user_set_passwd"}));
+    EXPECT_EQ(FaultOf(TAVOUserSetPasswd(nullptr, nullptr, nullptr, nullptr, 1)),
+              (Fault{ERR_BAD_PARAMETERS, "user_set_passwd"}));
 }
 
 }  // namespace
