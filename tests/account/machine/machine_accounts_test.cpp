@@ -2,7 +2,8 @@
 #include "tavo_group.h"
 #include "tavo_user.h"
 
-#include "machine_users.h"
+#include "account/group/group_fixture.h"
+#include "account/user/user_fixture.h"
 #include "support/machine.h"
 #include "support/scratch_dir.h"
 
@@ -13,37 +14,14 @@
 
 namespace {
 
-using test::ReadFile;
+using test::LineOf;
 using test::Shell;
 using test::WriteFile;
 using testing::HasSubstr;
-using testing::StartsWith;
 
 constexpr char samba_file[] = "/usr/tavo/etc/private/smbpasswd";
 constexpr char settings[] = "/root/smb.conf";
 constexpr char juergen[] = "J\xC3\xBCrgen_M";
-
-int AddUser(const char *name, const char *password, int expires = -1)
-{
-    TAVOUSER user = {};
-    user.szName = const_cast<char *>(name);
-    user.szPasswd = const_cast<char *>(password);
-    user.szDesc = const_cast<char *>("One: of us");
-    user.szShell = const_cast<char *>("/bin/sh");
-    user.nUid = user.nGid = -1;
-    user.nExpired = expires;
-    TLIBErrSet(ERR_SUCCESS);
-    return TAVOUserSetOne(nullptr, &user) == 0 ? TLIBErrGet() : -1;
-}
-
-std::string LineOf(const char *path, const std::string &name)
-{
-    std::istringstream lines(ReadFile(path));
-    for (std::string line; std::getline(lines, line);)
-        if (line.starts_with(name + ":"))
-            return line;
-    return {};
-}
 
 std::string Field(const std::string &line, int index)
 {
@@ -61,9 +39,11 @@ class MachineAccounts : public test::MachineTest {
         test::MachineTest::SetUp();
         if (IsSkipped())
             return;
-        test::DeleteUsers({"anna", juergen, "next"});
-        ASSERT_EQ(AddUser("anna", "secret one"), 0);
-        ASSERT_EQ(AddUser(juergen, "gr\xC3\xBC\xC3\x9F", 24502), 0);
+        test::DeleteUsers({"anna", juergen});
+        ASSERT_EQ(
+            test::AddUser({.name = "anna", .password = "secret one", .description = "One: of us", .shell = "/bin/sh"}),
+            0);
+        ASSERT_EQ(test::AddUser({.name = juergen, .password = "gr\xC3\xBC\xC3\x9F", .expire = 24502}), 0);
         WriteFile(settings, "[global]\npassdb backend = smbpasswd:" + std::string(samba_file) +
                                 "\nlanman auth = yes\nprivate dir = /root\nlock directory = /root\nstate directory = "
                                 "/root\ncache directory = /root\npid directory = /root\n");
@@ -72,12 +52,7 @@ class MachineAccounts : public test::MachineTest {
 
 TEST_F(MachineAccounts, TheSystemsOwnToolsReadWhatTheLibraryWrites)
 {
-    const char *const members[] = {"anna", nullptr};
-    TAVOGROUP group = {};
-    group.szName = const_cast<char *>("staff");
-    group.nGid = -1;
-    group.rgszMember = const_cast<char **>(members);
-    ASSERT_EQ(TAVOGroupSet(nullptr, &group), 0);
+    ASSERT_EQ(test::AddGroup("staff", -1, {"anna"}), 0);
 
     for (const char *name : {"anna", juergen}) {
         EXPECT_EQ(Shell("getent passwd " + std::string(name)).output, LineOf("/etc/passwd", name) + "\n");
@@ -106,30 +81,6 @@ TEST_F(MachineAccounts, SambaReadsWhatTheLibraryWrites)
     }
     EXPECT_THAT(Shell("pdbedit -s " + std::string(settings) + " -L -v anna").output,
                 testing::AllOf(HasSubstr("Unix username:        anna"), HasSubstr("Account Flags:        [U ")));
-}
-
-TEST_F(MachineAccounts, SambaHashesAsTheLibraryDoes)
-{
-    const struct {
-        const char *name;
-        const char *password;
-    } cases[] = {{"anna", "Another Secret 14+"},
-                 {juergen, "\xC3\xB6"
-                           "ffne Dich"},
-                 {"anna", "x"}};
-    for (const auto &[name, password] : cases) {
-        const std::string typed = std::string("printf '%s\\n%s\\n' '") + password + "' '" + password + "'";
-        const test::CommandResult set = Shell(typed + " | LC_ALL=C.UTF-8 smbpasswd -c " + settings + " -s " + name);
-        EXPECT_EQ(set.status, 0) << set.output;
-        const std::string line = LineOf(samba_file, name);
-        unsigned char hash[16];
-        ASSERT_EQ(TLIBSmbMd4Hash(password, hash), 0);
-        EXPECT_EQ(Field(line, 3), test::Hex(hash)) << password;
-        // What Samba changed stays when the library writes the file the next time.
-        test::DeleteUsers({"next"});
-        ASSERT_EQ(AddUser("next", "p"), 0);
-        EXPECT_EQ(Field(LineOf(samba_file, name), 3), Field(line, 3));
-    }
 }
 
 }  // namespace
