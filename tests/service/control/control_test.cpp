@@ -6,6 +6,7 @@
 
 #include "service_root.h"
 #include "support/fault_state.h"
+#include "support/own_child.h"
 #include "support/scenario.h"
 #include "support/scratch_dir.h"
 #include "support/stale_stack.h"
@@ -28,6 +29,7 @@
 #include <unistd.h>
 
 using test::Fault;
+using test::FaultOf;
 using test::IsUp;
 using test::LastFault;
 using test::LinkTarget;
@@ -45,8 +47,7 @@ TEST(ServiceLookUps, RowsAndRefusals)
     test::ForgetFault();
     EXPECT_EQ(TAVOServiceIndexGet("db"), -1);
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS) << "an unknown name is an answer";
-    EXPECT_EQ(TAVOServiceIndexGet(nullptr), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_interface"}));
+    EXPECT_EQ(FaultOf(TAVOServiceIndexGet(nullptr)), (Fault{ERR_BAD_PARAMETERS, "service_interface"}));
 
     for (const int id : {-1, 31, 1000}) {
         test::ForgetFault();
@@ -71,31 +72,22 @@ TEST(ServiceLookUps, RowsAndRefusals)
     EXPECT_EQ(TAVOServiceShareIDGet(30)[0], TAVO_SERVICE_SHARE_END);
     EXPECT_EQ(TAVOServiceTypeGet(30), -1);
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
-    EXPECT_EQ(TAVOServiceActionSet(30, TAVO_SERVICE_START), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_SERVICE_ACTION, "service_action_set"}));
+    EXPECT_EQ(FaultOf(TAVOServiceActionSet(30, TAVO_SERVICE_START)), (Fault{ERR_SERVICE_ACTION, "service_action_set"}));
 
-    const struct {
-        int id;
-        int type;
-    } types[] = {{9, 0}, {4, 0}, {12, 1}, {13, 1}, {18, 2}, {19, 2}, {21, 3}, {26, 3}};
-    for (const auto &row : types)
-        EXPECT_EQ(TAVOServiceTypeGet(row.id), row.type) << row.id;
-
-    const struct {
-        const char *name;
-        int mask;
-    } masks[] = {{"web", 0x40},
-                 {"netbackup", 0x100},
-                 {"SURVEILLANCE", 0x2000},
-                 {"photo", 0x5082},
-                 {"Video", 0x1802},
-                 {"music", 0x241802},
-                 {"homes", 0},
-                 {"", -1}};
-    for (const auto &row : masks)
-        EXPECT_EQ(TAVOServiceDaemonGet(row.name), row.mask) << row.name;
-    EXPECT_EQ(TAVOServiceDaemonGet(nullptr), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_daemon_get"}));
+    const std::pair<int, int> types[] = {{9, 0}, {4, 0}, {12, 1}, {13, 1}, {18, 2}, {19, 2}, {21, 3}, {26, 3}};
+    for (const auto &[id, type] : types)
+        EXPECT_EQ(TAVOServiceTypeGet(id), type) << id;
+    const std::pair<const char *, int> masks[] = {{"web", 0x40},
+                                                  {"netbackup", 0x100},
+                                                  {"SURVEILLANCE", 0x2000},
+                                                  {"photo", 0x5082},
+                                                  {"Video", 0x1802},
+                                                  {"music", 0x241802},
+                                                  {"homes", 0},
+                                                  {"", -1}};
+    for (const auto &[name, mask] : masks)
+        EXPECT_EQ(TAVOServiceDaemonGet(name), mask) << name;
+    EXPECT_EQ(FaultOf(TAVOServiceDaemonGet(nullptr)), (Fault{ERR_BAD_PARAMETERS, "service_daemon_get"}));
 }
 
 TEST(NetService, DrivesDaemonsInItsOwnOrder)
@@ -185,65 +177,58 @@ TEST(NetService, ReloadsBySignal)
 // would signal other processes, or all of them.
 TEST(NetService, IgnoresHostilePidFiles)
 {
-    const struct {
-        uint32_t daemon;
-        const char *pid_file;
-        const char *log;
-    } rows[] = {
-        {TAVO_DAEMON_AFP, "/var/run/afpd.pid", "/var/standin/afpd.log"},
-        {TAVO_DAEMON_SMB, "/var/run/smbd.pid", "/var/standin/smbd.log"},
-        {TAVO_DAEMON_WEB_USER, "/var/run/httpd-user.pid", "/var/standin/httpd-user.log"},
-        {TAVO_DAEMON_WEB_SYSTEM, "/var/run/httpd-sys.pid", "/var/standin/httpd-sys.log"},
-        {TAVO_DAEMON_WEBDAV, "/var/run/httpd-webdav.pid", "/var/standin/httpd-webdav.log"},
-        {TAVO_DAEMON_MEDIA, "/var/run/dms.pid", "/var/standin/dms.log"},
-        {TAVO_DAEMON_NETBKP, "/var/run/rsyncd.pid", "/var/standin/rsyncd.log"},
+    const std::pair<uint32_t, std::string> rows[] = {
+        {TAVO_DAEMON_AFP, "afpd"},
+        {TAVO_DAEMON_SMB, "smbd"},
+        {TAVO_DAEMON_WEB_USER, "httpd-user"},
+        {TAVO_DAEMON_WEB_SYSTEM, "httpd-sys"},
+        {TAVO_DAEMON_WEBDAV, "httpd-webdav"},
+        {TAVO_DAEMON_MEDIA, "dms"},
+        {TAVO_DAEMON_NETBKP, "rsyncd"},
     };
-    // A bystander that a hang-up would end.
-    const pid_t bystander = ::fork();
-    if (bystander == 0) {
+    // A hang-up would end it.
+    const test::OwnChild bystander([] {
         ::signal(SIGHUP, SIG_DFL);
-        for (;;)
-            ::pause();
-    }
-    const std::string other = std::to_string(bystander);
+        ::pause();
+    });
+    const std::string other = std::to_string(bystander.Pid());
     ASSERT_EQ(TLIBFileSetKeyValue("/etc/tavoinfo.conf", "runafp", "yes", nullptr), 1);
-    for (const auto &row : rows) {
-        SCOPED_TRACE(row.pid_file);
-        ASSERT_GT(TAVONetService(row.daemon, TAVO_DAEMON_START), 0);
-        const auto expect_no_signal = [&] {
-            EXPECT_EQ(TAVONetService(row.daemon, TAVO_DAEMON_RELOAD), 0);
-            EXPECT_EQ(::kill(bystander, 0), 0);
+    for (const auto &[daemon, name] : rows) {
+        SCOPED_TRACE(name);
+        const std::string pid_path = "/var/run/" + name + ".pid";
+        const char *const pid_file = pid_path.c_str();
+        ASSERT_GT(TAVONetService(daemon, TAVO_DAEMON_START), 0);
+        const auto expect_no_signal = [&, mask = daemon] {
+            EXPECT_EQ(TAVONetService(mask, TAVO_DAEMON_RELOAD), 0);
+            EXPECT_EQ(::waitpid(bystander.Pid(), nullptr, WNOHANG), 0);
         };
         for (const std::string &text : {std::string("-1\n"), other + " 1\n", other + " " + other, std::string("0\n"),
                                         "-" + other, std::string(4096, '9'), other + "; reboot", std::string()}) {
-            test::WriteFile(row.pid_file, text);
+            test::WriteFile(pid_file, text);
             expect_no_signal();
         }
         // Another user's file, and a link to one.
-        test::WriteFile(row.pid_file, other + "\n");
-        ASSERT_EQ(::chown(row.pid_file, 1000, 1000), 0);
+        test::WriteFile(pid_file, other + "\n");
+        ASSERT_EQ(::chown(pid_file, 1000, 1000), 0);
         expect_no_signal();
-        std::filesystem::remove(row.pid_file);
-        ASSERT_EQ(::symlink("/tmp/elsewhere.pid", row.pid_file), 0);
+        std::filesystem::remove(pid_file);
+        ASSERT_EQ(::symlink("/tmp/elsewhere.pid", pid_file), 0);
         test::WriteFile("/tmp/elsewhere.pid", other + "\n");
         expect_no_signal();
-        std::filesystem::remove(row.pid_file);
-        ASSERT_EQ(::mkfifo(row.pid_file, 0600), 0);
+        std::filesystem::remove(pid_file);
+        ASSERT_EQ(::mkfifo(pid_file, 0600), 0);
         expect_no_signal();
-        std::filesystem::remove(row.pid_file);
-        EXPECT_THAT(test::ReadFile(row.log), testing::Not(testing::HasSubstr("signal 1\n")));
+        std::filesystem::remove(pid_file);
+        EXPECT_THAT(test::ReadFile("/var/standin/" + name + ".log"), testing::Not(testing::HasSubstr("signal 1\n")));
     }
-    ::kill(bystander, SIGKILL);
-    ::waitpid(bystander, nullptr, 0);
 }
 
 TEST(NetService, RefusesAndLogs)
 {
     test::CapturedLog log;
-    EXPECT_EQ(TAVONetService(0, TAVO_DAEMON_START), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_net_service"}));
-    ASSERT_EQ(log.Lines().size(), 1u);
-    EXPECT_THAT(log.Lines()[0].text, testing::MatchesRegex("service_net_service\\([0-9]+\\):  bad parameter"));
+    EXPECT_EQ(FaultOf(TAVONetService(0, TAVO_DAEMON_START)), (Fault{ERR_BAD_PARAMETERS, "service_net_service"}));
+    EXPECT_THAT(log.Texts(),
+                testing::ElementsAre(testing::MatchesRegex("service_net_service\\([0-9]+\\):  bad parameter")));
     EXPECT_EQ(TAVONetService(TAVO_DAEMON_CRON, 5), -1);
     EXPECT_THAT(ScriptCalls(), IsEmpty());
 }
@@ -266,39 +251,28 @@ TEST(NetService, TwoProcessesNeverInterleave)
 {
     for (const char *script : {"S04crond.sh", "S99mDNS.sh"})
         test::WriteFile(std::string("/var/standin/") + script + ".hook", "#!/bin/sh\nsleep 0.03\n", 0755);
-    std::vector<pid_t> children;
-    for (int i = 0; i < 2; ++i) {
-        const pid_t child = ::fork();
-        if (child == 0) {
-            ErrTLIBFileCloseLock();
-            bool done = true;
-            for (int round = 0; round < 4; ++round)
-                done = TAVONetService(TAVO_DAEMON_CRON | TAVO_DAEMON_MDNS, TAVO_DAEMON_RESTART) > 0 && done;
-            ::_exit(!done);
-        }
-        children.push_back(child);
-    }
-    for (const pid_t child : children) {
-        int status = 0;
-        ::waitpid(child, &status, 0);
-        EXPECT_EQ(status, 0);
-    }
+    const auto work = [] {
+        ErrTLIBFileCloseLock();
+        bool done = true;
+        for (int round = 0; round < 4; ++round)
+            done = TAVONetService(TAVO_DAEMON_CRON | TAVO_DAEMON_MDNS, TAVO_DAEMON_RESTART) > 0 && done;
+        ::_exit(!done);
+    };
+    test::OwnChild children[] = {test::OwnChild(work), test::OwnChild(work)};
+    for (test::OwnChild &child : children)
+        EXPECT_EQ(child.Status(), 0);
     const std::vector<std::string> events = test::ScriptEvents();
     ASSERT_EQ(events.size(), 32u);
-    for (size_t i = 0; i < events.size(); i += 4) {
-        EXPECT_EQ(events[i], "S04crond.sh restart");
-        EXPECT_EQ(events[i + 1], "S04crond.sh restart = 0");
-        EXPECT_EQ(events[i + 2], "S99mDNS.sh restart");
-        EXPECT_EQ(events[i + 3], "S99mDNS.sh restart = 0");
+    for (long i = 0; i < 32; i += 4) {
+        EXPECT_THAT(std::vector(events.begin() + i, events.begin() + i + 4),
+                    ElementsAre("S04crond.sh restart", "S04crond.sh restart = 0", "S99mDNS.sh restart",
+                                "S99mDNS.sh restart = 0"));
     }
 }
 
 TEST_F(Services, DataFoldersAreBoundInOrderAndNamedByTheirRule)
 {
     ASSERT_EQ(TAVOServiceActionSet(4, TAVO_SERVICE_ENABLE), 0);
-    EXPECT_EQ(LinkTarget("/var/services/music"), "/volume2/music");
-    EXPECT_EQ(LinkTarget("/var/services/video"), "/volume2/video");
-    EXPECT_EQ(LinkTarget("/var/services/photo"), "/volume2/photo");
     ASSERT_EQ(TAVOServiceActionSet(7, TAVO_SERVICE_ENABLE), 0);
     EXPECT_EQ(LinkTarget("/var/services/mysql"), "/volume2/@database/mysql");
     ASSERT_EQ(TAVOServiceActionSet(3, TAVO_SERVICE_ENABLE), 0);
@@ -341,10 +315,8 @@ TEST_F(Services, LogsEachFailedStepOfAnAction)
 {
     const auto expect = [&](int code, const char *text) {
         EXPECT_EQ(TLIBErrGet(), code) << text;
-        std::vector<std::string> lines;
-        for (const auto &line : log_.Lines())
-            lines.push_back(line.text);
-        EXPECT_THAT(lines, testing::Contains(testing::MatchesRegex("service_std_action:[0-9]+ " + std::string(text))));
+        EXPECT_THAT(log_.Texts(),
+                    testing::Contains(testing::MatchesRegex("service_std_action:[0-9]+ " + std::string(text))));
         log_.Clear();
     };
 
@@ -383,8 +355,8 @@ TEST_F(Services, LogsEachFailedStepOfAnAction)
     std::filesystem::remove("/etc/tavoinfo.conf");
     std::filesystem::rename("/etc/tavoinfo.conf.away", "/etc/tavoinfo.conf");
 
-    EXPECT_EQ(TAVOServiceSTDAction(nullptr, TAVO_SERVICE_START), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_std_action"}));
+    EXPECT_EQ(FaultOf(TAVOServiceSTDAction(nullptr, TAVO_SERVICE_START)),
+              (Fault{ERR_BAD_PARAMETERS, "service_std_action"}));
 }
 
 TEST_F(Services, TheOldVolumeIsKeptAndAFullDeskHasNone)
@@ -435,10 +407,8 @@ TEST_F(Services, AVolumeGoesAndComesBack)
     EXPECT_EQ(TAVOServiceIsOnVolume(1, "/volume2"), 1) << "that is where it belongs";
     EXPECT_EQ(TAVOServiceIsOnVolume(1, "/volume1"), 0);
     for (const char *path : {"", "/volume", "/volume2/", static_cast<const char *>(nullptr)}) {
-        EXPECT_EQ(TAVOServiceIsOnVolume(1, path), -1) << path;
-        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_is_on_volume"}));
-        EXPECT_EQ(TAVOServiceRestore(path), -1) << path;
-        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_restore"}));
+        EXPECT_EQ(FaultOf(TAVOServiceIsOnVolume(1, path)), (Fault{ERR_BAD_PARAMETERS, "service_is_on_volume"})) << path;
+        EXPECT_EQ(FaultOf(TAVOServiceRestore(path)), (Fault{ERR_BAD_PARAMETERS, "service_restore"})) << path;
     }
     EXPECT_EQ(TAVOServiceIsOnVolume(0, "/volume2"), -1);
 
@@ -500,10 +470,8 @@ TEST_F(Services, OnlyALinkIsReplaced)
     std::filesystem::create_directories("/var/services");
     ASSERT_EQ(::mkdir("/var/services/web", 0755), 0);
     test::WriteFile("/var/services/web/precious", "x");
-    EXPECT_EQ(TAVOServiceLinkSet(1, "/volume1/web"), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_UNKNOWN, "service_volume_getby_link"}));
-    EXPECT_EQ(TAVOServiceLinkRemove(1), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_REMOVE_FAILED, "service_link_remove"}));
+    EXPECT_EQ(FaultOf(TAVOServiceLinkSet(1, "/volume1/web")), (Fault{ERR_UNKNOWN, "service_volume_getby_link"}));
+    EXPECT_EQ(FaultOf(TAVOServiceLinkRemove(1)), (Fault{ERR_REMOVE_FAILED, "service_link_remove"}));
     EXPECT_EQ(test::ReadFile("/var/services/web/precious"), "x");
 
     // No link can be below a file, so there is none to remove.
@@ -518,8 +486,8 @@ TEST_F(Services, OnlyALinkIsReplaced)
 
     ASSERT_EQ(::mkdir("/volume1/elsewhere", 0755), 0);
     ASSERT_EQ(::symlink("/volume1/elsewhere", "/volume1/photo"), 0);
-    EXPECT_EQ(TAVOServiceShareCreate(2, "/volume1"), -1) << "somebody's link is no data folder";
-    EXPECT_EQ(LastFault(), (Fault{ERR_MKDIR_FAILED, "service_share_create"}));
+    EXPECT_EQ(FaultOf(TAVOServiceShareCreate(2, "/volume1")), (Fault{ERR_MKDIR_FAILED, "service_share_create"}))
+        << "somebody's link is no data folder";
 
     ASSERT_EQ(TAVOServiceSet(5, "/volume1"), 0);
     ASSERT_EQ(::symlink("/volume1/elsewhere", "/volume1/video/link"), 0);
@@ -540,8 +508,7 @@ TEST_F(Services, SharedFoldersAreReleasedByTheLast)
     ASSERT_EQ(TAVOServiceActionSet(6, TAVO_SERVICE_KEY_NO), 0);
     EXPECT_EQ(TAVOServiceRemovebyInfo(&audio, 0), 0);
     EXPECT_EQ(LinkTarget("/var/services/music"), "");
-    EXPECT_EQ(TAVOServiceRemovebyInfo(nullptr, 0), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_removeby_info"}));
+    EXPECT_EQ(FaultOf(TAVOServiceRemovebyInfo(nullptr, 0)), (Fault{ERR_BAD_PARAMETERS, "service_removeby_info"}));
 }
 
 TEST_F(Services, TheRecordHasTheCapabilityAndTheFolder)
@@ -582,10 +549,9 @@ TEST_F(Services, TheRecordHasTheCapabilityAndTheFolder)
     TLIBErrSet(ERR_OPEN_FAILED);
     EXPECT_EQ(TAVOServiceSettingGet(1, &share), 0);
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS) << "a link that leads anywhere clears the error";
-    ASSERT_EQ(log_.Lines().size(), 1u);
-    EXPECT_THAT(log_.Lines()[0].text,
-                testing::MatchesRegex("service_setting_get:[0-9]+ Failed to check volume type: path=\\[/nowhere\\], "
-                                      "tavoerr=0x6000"));
+    EXPECT_THAT(log_.Texts(), testing::ElementsAre(testing::MatchesRegex(
+                                  "service_setting_get:[0-9]+ Failed to check volume type: path=\\[/nowhere\\], "
+                                  "tavoerr=0x6000")));
     EXPECT_STREQ(share.szVolume, "/nowhere/web");
     EXPECT_STREQ(share.szVolumePath, "/nowhere");
     EXPECT_EQ(share.fOnVolume, 0);
@@ -597,8 +563,7 @@ TEST_F(Services, TheRecordHasTheCapabilityAndTheFolder)
     EXPECT_EQ(share.fSpecialVolume, 1);
 
     for (const int id : {0, 12, -1}) {
-        EXPECT_EQ(TAVOServiceSettingGet(id, &share), -1);
-        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_setting_get"}));
+        EXPECT_EQ(FaultOf(TAVOServiceSettingGet(id, &share)), (Fault{ERR_BAD_PARAMETERS, "service_setting_get"}));
     }
     EXPECT_EQ(TAVOServiceSettingGet(1, nullptr), -1);
 }
@@ -642,28 +607,22 @@ TEST_F(Services, AMissingLinkFolderIsCreated)
 
     log_.Clear();
     ASSERT_EQ(::mount("tmpfs", "/var", "tmpfs", MS_RDONLY, nullptr), 0);
-    EXPECT_EQ(TAVOServiceLinkSet(1, "/volume1/web"), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_MKDIR_FAILED, "service_link_set"}));
+    EXPECT_EQ(FaultOf(TAVOServiceLinkSet(1, "/volume1/web")), (Fault{ERR_MKDIR_FAILED, "service_link_set"}));
     ::umount2("/var", MNT_DETACH);
-    ASSERT_EQ(log_.Lines().size(), 1u);
-    EXPECT_THAT(log_.Lines()[0].text,
-                testing::MatchesRegex("service_link_set\\([0-9]+\\)Failed to mkdir : /var/services"));
+    EXPECT_THAT(log_.Texts(), testing::ElementsAre(testing::MatchesRegex(
+                                  "service_link_set\\([0-9]+\\)Failed to mkdir : /var/services")));
 
     ASSERT_EQ(::mount("tmpfs", "/var", "tmpfs", 0, "nr_inodes=1"), 0);
-    EXPECT_EQ(TAVOServiceLinkSet(1, "/volume1/web"), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_NOT_ENOUGH_SPACE, "service_link_set"}));
+    EXPECT_EQ(FaultOf(TAVOServiceLinkSet(1, "/volume1/web")), (Fault{ERR_NOT_ENOUGH_SPACE, "service_link_set"}));
     ::umount2("/var", MNT_DETACH);
 
     for (const char *target : {"", static_cast<const char *>(nullptr)}) {
-        EXPECT_EQ(TAVOServiceLinkSet(1, target), -1);
-        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_link_set"}));
+        EXPECT_EQ(FaultOf(TAVOServiceLinkSet(1, target)), (Fault{ERR_BAD_PARAMETERS, "service_link_set"}));
     }
     log_.Clear();
-    EXPECT_EQ(TAVOServiceLinkSet(12, "/volume1/web"), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_setting_get"}));
-    ASSERT_EQ(log_.Lines().size(), 1u);
-    EXPECT_THAT(log_.Lines()[0].text,
-                testing::MatchesRegex("service_link_set\\([0-9]+\\)\\[D00\\] Failed to get service info : id = 12"));
+    EXPECT_EQ(FaultOf(TAVOServiceLinkSet(12, "/volume1/web")), (Fault{ERR_BAD_PARAMETERS, "service_setting_get"}));
+    EXPECT_THAT(log_.Texts(), testing::ElementsAre(testing::MatchesRegex(
+                                  "service_link_set\\([0-9]+\\)\\[D00\\] Failed to get service info : id = 12")));
 }
 
 // A status asks the settings for a plain "no"; any other value, or none, is a yes.
@@ -689,19 +648,17 @@ TEST(ServiceSTDStatus, IsEnabledUnlessTheKeySaysNo)
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_std_status"}));
 
     // While another program holds the lock, the answer is unknown.
-    const pid_t holder = ::fork();
-    if (holder == 0) {
-        ErrTLIBFileCloseLock();
-        ErrTLIBFileLock(TAVO_LOCK_TAVOINFO | TAVO_LOCK_EXCLUSIVE, 0);
-        test::WriteFile("/tmp/held", "");
-        for (;;)
+    {
+        const test::OwnChild holder([] {
+            ErrTLIBFileCloseLock();
+            ErrTLIBFileLock(TAVO_LOCK_TAVOINFO | TAVO_LOCK_EXCLUSIVE, 0);
+            test::WriteFile("/tmp/held", "");
             ::pause();
+        });
+        ASSERT_TRUE(test::Eventually([] { return std::filesystem::exists("/tmp/held"); }));
+        EXPECT_EQ(TAVOServiceStatusGet(18), 0);
+        EXPECT_EQ(TLIBErrGet(), ERR_LOCK_FAILED);
     }
-    ASSERT_TRUE(test::Eventually([] { return std::filesystem::exists("/tmp/held"); }));
-    EXPECT_EQ(TAVOServiceStatusGet(18), 0);
-    EXPECT_EQ(TLIBErrGet(), ERR_LOCK_FAILED);
-    ::kill(holder, SIGKILL);
-    ::waitpid(holder, nullptr, 0);
     EXPECT_EQ(TAVOServiceStatusGet(18), 1);
 }
 
@@ -731,18 +688,17 @@ TEST(ServiceVolumeGetbyLink, FollowsAndRefuses)
 
     ::unlink(link.c_str());
     ASSERT_EQ(::symlink(("/" + std::string(60, 'x')).c_str(), link.c_str()), 0);
-    EXPECT_EQ(follow(), -1) << "cut, it would name another folder";
-    EXPECT_EQ(LastFault(), (Fault{ERR_UNKNOWN, "service_volume_getby_link"}));
+    EXPECT_EQ(FaultOf(follow()), (Fault{ERR_UNKNOWN, "service_volume_getby_link"}))
+        << "cut, it would name another folder";
     ::unlink(link.c_str());
     test::WriteFile(link, "a file");
-    EXPECT_EQ(follow(), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_UNKNOWN, "service_volume_getby_link"}));
+    EXPECT_EQ(FaultOf(follow()), (Fault{ERR_UNKNOWN, "service_volume_getby_link"}));
 
     EXPECT_EQ(TAVOServiceVolumeGetbyLink("", volume, 52, path, 52), -1);
     EXPECT_EQ(TAVOServiceVolumeGetbyLink(link.c_str(), nullptr, 52, path, 52), -1);
     EXPECT_EQ(TAVOServiceVolumeGetbyLink(link.c_str(), volume, 0, path, 52), -1);
-    EXPECT_EQ(TAVOServiceVolumeGetbyLink(link.c_str(), volume, 52, path, -1), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_volume_getby_link"}));
+    EXPECT_EQ(FaultOf(TAVOServiceVolumeGetbyLink(link.c_str(), volume, 52, path, -1)),
+              (Fault{ERR_BAD_PARAMETERS, "service_volume_getby_link"}));
 }
 
 TEST(ServiceEnableGet, TakesYesInAnyCase)
@@ -763,9 +719,8 @@ TEST(ServiceEnableGet, TakesYesInAnyCase)
     test::CapturedLog log;
     ASSERT_EQ(TLIBFileSetKeyValue("/etc/tavoinfo.conf", "download_enabled", "yes", nullptr), 1);
     EXPECT_EQ(TAVOServiceEnableGet(4), 0);
-    ASSERT_EQ(log.Lines().size(), 1u);
-    EXPECT_THAT(log.Lines()[0].text,
-                testing::MatchesRegex("service_enable_get\\([0-9]+\\)\\[900\\] Failed to get info of download deck"));
+    EXPECT_THAT(log.Texts(), testing::ElementsAre(testing::MatchesRegex(
+                                 "service_enable_get\\([0-9]+\\)\\[900\\] Failed to get info of download deck")));
     // A scheduler that has never been configured has no such key.
     test::WriteFile("/usr/tavo/etc/download.conf", "other=yes\n");
     test::ForgetFault();

@@ -17,6 +17,8 @@
 using test::DaemonPid;
 using test::Eventually;
 using test::Fault;
+using test::FaultOf;
+
 using test::HasEnded;
 using test::IsUp;
 using test::LastFault;
@@ -189,6 +191,7 @@ class Every : public test::Services, public testing::WithParamInterface<Row> {
     {
         for (const std::string &daemon : row.daemons)
             EXPECT_TRUE(test::Runs(daemon)) << daemon;
+        EXPECT_TRUE(IsOn());
     }
 
     void ExpectStopped() const
@@ -206,103 +209,63 @@ class Every : public test::Services, public testing::WithParamInterface<Row> {
     const char *const key = TAVOServiceKeyGet(row.id);
 };
 
-class Keyed : public Every {};
-class Keyless : public Every {};
 class WithDaemon : public Every {};
 class WithPidFile : public Every {};
 
-TEST_P(Keyed, EveryAction)
-{
-    ScriptCalls();
-    EXPECT_EQ(Act(TAVO_SERVICE_KEY_NO), 0);
-    EXPECT_EQ(Setting(key), "no");
-    EXPECT_EQ(TAVOServiceStatusGet(row.id), 0);
-    EXPECT_EQ(Act(TAVO_SERVICE_KEY_YES), 0);
-    EXPECT_EQ(Setting(key), "yes");
-    EXPECT_THAT(ScriptCalls(), IsEmpty()) << "the key alone";
-
-    ASSERT_EQ(Act(TAVO_SERVICE_KEY_NO), 0);
-    EXPECT_EQ(Act(TAVO_SERVICE_ENABLE), 0);
-    EXPECT_EQ(Setting(key), "yes");
-    EXPECT_EQ(ScriptCalls(), row.start);
-    ExpectRunning();
-    EXPECT_TRUE(IsOn());
-    ExpectBound(true);
-
-    EXPECT_EQ(Act(TAVO_SERVICE_STOP), 0);
-    EXPECT_EQ(Setting(key), "yes");
-    EXPECT_EQ(ScriptCalls(), row.stop);
-    ExpectStopped();
-    EXPECT_TRUE(Eventually([&] { return TAVOServiceStatusGet(row.id) == row.on_when_stopped; }));
-    ExpectBound(true);
-
-    EXPECT_EQ(Act(TAVO_SERVICE_START), 0);
-    EXPECT_EQ(ScriptCalls(), row.start);
-    ExpectRunning();
-    EXPECT_TRUE(IsOn());
-
-    std::map<std::string, pid_t> before;
-    for (const std::string &daemon : row.daemons)
-        before[daemon] = DaemonPid(daemon);
-    EXPECT_EQ(Act(TAVO_SERVICE_RESTART), 0);
-    EXPECT_EQ(ScriptCalls(), row.restart);
-    ExpectRunning();
-    for (const std::string &daemon : row.daemons)
-        EXPECT_NE(DaemonPid(daemon), before[daemon]) << daemon;
-    EXPECT_TRUE(IsOn());
-
-    EXPECT_EQ(Act(TAVO_SERVICE_DISABLE), 0);
-    EXPECT_EQ(Setting(key), "no");
-    EXPECT_EQ(ScriptCalls(), row.stop);
-    ExpectStopped();
-    EXPECT_EQ(TAVOServiceStatusGet(row.id), 0) << "whatever still runs";
-    ExpectBound(false);
-
-    for (const int action : {-1, 7}) {
-        EXPECT_EQ(Act(action), -1);
-        EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
-    }
-    EXPECT_EQ(Setting(key), "no");
-    EXPECT_THAT(ScriptCalls(), IsEmpty());
-}
-
-TEST_P(Keyless, EveryAction)
+TEST_P(Every, Action)
 {
     const std::string settings = test::ReadFile("/etc/tavoinfo.conf");
     ScriptCalls();
-    for (const auto &[start, stop] :
-         {std::pair(TAVO_SERVICE_ENABLE, TAVO_SERVICE_DISABLE), std::pair(TAVO_SERVICE_START, TAVO_SERVICE_STOP)}) {
-        if (row.id == kRestore) {
-            for (const int action : {+start, +stop, +TAVO_SERVICE_RESTART}) {
-                EXPECT_EQ(Act(action), -1) << "it has no command";
-                EXPECT_EQ(LastFault(), (Fault{ERR_SERVICE_STD_ACTION, "service_action_set"}));
-            }
-            continue;
-        }
-        EXPECT_TRUE(Eventually([&] { return TAVOServiceStatusGet(row.id) == 0; }));
-        EXPECT_EQ(Act(start), 0);
-        EXPECT_EQ(ScriptCalls(), row.start);
-        ExpectRunning();
-        EXPECT_TRUE(IsOn());
-        EXPECT_EQ(Act(TAVO_SERVICE_RESTART), 0);
-        EXPECT_EQ(ScriptCalls(), row.restart);
-        ExpectRunning();
-        EXPECT_TRUE(IsOn());
-        EXPECT_EQ(Act(stop), 0);
-        EXPECT_EQ(ScriptCalls(), row.stop);
-        ExpectStopped();
+    if (row.id == kRestore) {
+        for (const int action : {TAVO_SERVICE_ENABLE, TAVO_SERVICE_DISABLE, TAVO_SERVICE_RESTART})
+            EXPECT_EQ(FaultOf(Act(action)), (Fault{ERR_SERVICE_STD_ACTION, "service_action_set"}))
+                << "it has no command";
+        return;
     }
-    log_.Clear();
-    for (const int action : {5, 6, 7, -1}) {
-        EXPECT_EQ(Act(action), -1) << action;
-        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_action_set"})) << action;
-        ASSERT_EQ(log_.Lines().size(), 1u);
-        EXPECT_THAT(log_.Lines()[0].text, MatchesRegex("service_action_set:[0-9]+ Illegal action with Daemon " +
-                                                       std::string(TAVOServiceNameGet(row.id))));
+    if (key) {
+        EXPECT_EQ(Act(TAVO_SERVICE_KEY_YES), 0);
+        EXPECT_EQ(Setting(key), "yes");
+        EXPECT_EQ(Act(TAVO_SERVICE_KEY_NO), 0);
+        EXPECT_EQ(Setting(key), "no");
+        EXPECT_EQ(TAVOServiceStatusGet(row.id), 0);
+        EXPECT_THAT(ScriptCalls(), IsEmpty()) << "the key alone";
+    }
+    const auto expect = [&](int action, const Texts &scripts, const char *value, bool running) {
+        SCOPED_TRACE(action);
+        EXPECT_EQ(Act(action), 0);
+        EXPECT_EQ(ScriptCalls(), scripts);
+        running ? ExpectRunning() : ExpectStopped();
+        if (key) {
+            EXPECT_EQ(Setting(key), value);
+            ExpectBound(value == std::string("yes"));
+        }
+    };
+    expect(TAVO_SERVICE_ENABLE, row.start, "yes", true);
+    expect(TAVO_SERVICE_STOP, row.stop, "yes", false);
+    EXPECT_TRUE(Eventually([&] { return TAVOServiceStatusGet(row.id) == row.on_when_stopped; }));
+    expect(TAVO_SERVICE_START, row.start, "yes", true);
+    std::map<std::string, pid_t> before;
+    for (const std::string &daemon : row.daemons)
+        before[daemon] = DaemonPid(daemon);
+    expect(TAVO_SERVICE_RESTART, row.restart, "yes", true);
+    for (const std::string &daemon : row.daemons)
+        EXPECT_NE(DaemonPid(daemon), before[daemon]) << daemon;
+    expect(TAVO_SERVICE_DISABLE, row.stop, "no", false);
+    EXPECT_TRUE(Eventually([&] { return TAVOServiceStatusGet(row.id) == 0; })) << "whatever still runs";
+
+    for (const int action : key ? std::vector{-1, 7} : std::vector{-1, 5, 6, 7}) {
         log_.Clear();
+        EXPECT_EQ(FaultOf(Act(action)).code, ERR_BAD_PARAMETERS) << action;
+        if (!key) {
+            EXPECT_THAT(log_.Texts(),
+                        testing::ElementsAre(MatchesRegex("service_action_set:[0-9]+ Illegal action with Daemon " +
+                                                          std::string(TAVOServiceNameGet(row.id)))));
+        }
     }
     EXPECT_THAT(ScriptCalls(), IsEmpty());
-    EXPECT_EQ(test::ReadFile("/etc/tavoinfo.conf"), settings);
+    if (!key) {
+        EXPECT_EQ(test::ReadFile("/etc/tavoinfo.conf"), settings);
+    }
 }
 
 // The key is written before the daemon is started: such a service is enabled and does not run.
@@ -339,25 +302,22 @@ TEST_P(WithDaemon, DoesNotEnd)
     EXPECT_TRUE(IsOn()) << "so it is still on";
 }
 
-// A pid file that does not name the daemon, whatever it contains, counts as none.
-TEST_P(WithPidFile, HasAPidFileThatIsNotItsOwn)
+// A pid file that does not name the daemon, whatever it contains, counts as none, and one that comes late is waited for.
+TEST_P(WithPidFile, CountsOnlyItsOwn)
 {
-    for (const char *mode : {"garbage", "stale", "nopid"}) {
+    for (const char *mode : {"garbage", "stale", "nopid", "late"}) {
         SCOPED_TRACE(mode);
         WriteFile("/var/standin/" + row.daemon + ".mode", mode);
         EXPECT_EQ(Act(key ? TAVO_SERVICE_ENABLE : TAVO_SERVICE_START), 0);
         EXPECT_TRUE(test::Runs(row.daemon));
-        EXPECT_EQ(TAVOServiceStatusGet(row.id), 0);
+        if (mode == std::string("late")) {
+            EXPECT_TRUE(IsUp(row.id));
+        } else {
+            EXPECT_EQ(TAVOServiceStatusGet(row.id), 0);
+        }
         std::filesystem::remove(TAVOServiceProcGet(row.id));
         test::ResetStandins();
     }
-}
-
-TEST_P(WithPidFile, WritesItLate)
-{
-    WriteFile("/var/standin/" + row.daemon + ".mode", "late\n");
-    EXPECT_EQ(Act(key ? TAVO_SERVICE_ENABLE : TAVO_SERVICE_START), 0);
-    EXPECT_TRUE(IsUp(row.id));
 }
 
 template <class Wanted>
@@ -373,12 +333,7 @@ std::string Name(const testing::TestParamInfo<Row> &info)
     return TAVOServiceNameGet(info.param.id);
 }
 
-INSTANTIATE_TEST_SUITE_P(Every, Keyed,
-                         testing::ValuesIn(Those([](const Row &row) { return TAVOServiceKeyGet(row.id) != nullptr; })),
-                         Name);
-INSTANTIATE_TEST_SUITE_P(Every, Keyless,
-                         testing::ValuesIn(Those([](const Row &row) { return TAVOServiceKeyGet(row.id) == nullptr; })),
-                         Name);
+INSTANTIATE_TEST_SUITE_P(Of, Every, testing::ValuesIn(rows), Name);
 INSTANTIATE_TEST_SUITE_P(Every, WithDaemon,
                          testing::ValuesIn(Those([](const Row &row) { return !row.daemon.empty(); })), Name);
 INSTANTIATE_TEST_SUITE_P(Every, WithPidFile, testing::ValuesIn(Those([](const Row &row) { return row.has_pid_file; })),

@@ -12,7 +12,7 @@
 #include <vector>
 
 using test::Fault;
-using test::LastFault;
+using test::FaultOf;
 using test::LinkTarget;
 using test::ScriptCalls;
 using test::ScriptEvents;
@@ -61,21 +61,18 @@ TEST_F(Services, AreListedByVolumeAndReleasedWithIt)
     EXPECT_THAT(NamesOnVolume("/volume1"), ElementsAre("mysql"));
     EXPECT_THAT(NamesOnVolume("/volume3"), IsEmpty());
     TLIBSZLIST *none = nullptr;
-    EXPECT_EQ(TAVOServiceGetbyVolume("/volume2", &none), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_getby_volume"}));
+    EXPECT_EQ(FaultOf(TAVOServiceGetbyVolume("/volume2", &none)), (Fault{ERR_BAD_PARAMETERS, "service_getby_volume"}));
     for (const char *volume : {"", "/volume", "/volume0", "/volume1/", "volume1"})
         EXPECT_EQ(TAVOServiceRemovebyVolume(volume, 0), -1) << volume;
 
     EXPECT_EQ(TAVOServiceShareIsEmpty(1), 1);
     test::WriteFile("/volume2/web/index.html", "x");
     EXPECT_EQ(TAVOServiceShareIsEmpty(1), 0);
-    EXPECT_EQ(TAVOServiceShareIsEmpty(2), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_MAKE_PATH, "service_share_is_empty"}));
+    EXPECT_EQ(FaultOf(TAVOServiceShareIsEmpty(2)), (Fault{ERR_MAKE_PATH, "service_share_is_empty"}));
 
     EXPECT_EQ(TAVOServiceRemovebyID(0, 0), 0);
     EXPECT_EQ(LinkTarget("/var/services/web"), "");
-    EXPECT_EQ(TAVOServiceRemovebyID(31, 0), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_removeby_id"}));
+    EXPECT_EQ(FaultOf(TAVOServiceRemovebyID(31, 0)), (Fault{ERR_BAD_PARAMETERS, "service_removeby_id"}));
     EXPECT_EQ(TAVOServiceRemoveAll(0), 0);
     EXPECT_THAT(NamesOnVolume("/volume1"), IsEmpty());
     EXPECT_EQ(test::ReadFile("/volume2/web/index.html"), "x");
@@ -86,8 +83,7 @@ TEST_F(Services, AreListedByVolumeAndReleasedWithIt)
     ASSERT_EQ(TAVOServiceSet(2, "/volume2"), 0);
     std::filesystem::remove("/var/services/web");
     test::WriteFile("/var/services/web", "a file");
-    EXPECT_EQ(TAVOServiceRemoveAll(0), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_SERVICE_REMOVE, "service_remove_all"}));
+    EXPECT_EQ(FaultOf(TAVOServiceRemoveAll(0)), (Fault{ERR_SERVICE_REMOVE, "service_remove_all"}));
     EXPECT_EQ(LinkTarget("/var/services/photo"), "");
 }
 
@@ -101,8 +97,7 @@ TEST_F(Services, ChangeTheirVolumeAndFindAnother)
     EXPECT_THAT(ScriptCalls(), ElementsAre("S86tavodms.sh restart", "S96tavorcd.sh restart", "S96tavoaudiod.sh restart",
                                            "S66tavoindexd.sh restart"))
         << "all that use the folder and are enabled";
-    EXPECT_EQ(TAVOServiceVolumeChange(6, "nowhere"), -1);
-    EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+    EXPECT_EQ(FaultOf(TAVOServiceVolumeChange(6, "nowhere")).code, ERR_BAD_PARAMETERS);
 
     // Only the record: nothing is linked or moved.
     EXPECT_EQ(TAVOServiceShareUpdate(6, "/volume2"), 0);
@@ -110,8 +105,7 @@ TEST_F(Services, ChangeTheirVolumeAndFindAnother)
     EXPECT_EQ(TAVOServiceVolumeGetbyShare("music", volume, sizeof volume), 9);
     EXPECT_STREQ(volume, "/volume2");
     EXPECT_EQ(LinkTarget("/var/services/music"), "/volume1/music");
-    EXPECT_EQ(TAVOServiceShareUpdate(1, "/volume2"), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_NO_SUCH_SHARE, "service_share_update"}));
+    EXPECT_EQ(FaultOf(TAVOServiceShareUpdate(1, "/volume2")), (Fault{ERR_NO_SUCH_SHARE, "service_share_update"}));
 
     // A volume is lost: services that have lost a folder are enabled again on the volumes left, the others go on.
     ASSERT_EQ(::umount2("/volume1", MNT_DETACH), 0);
@@ -140,8 +134,7 @@ TEST(ServiceThirdPartyAll, RunsPackagesInOrderAndBackwards)
     EXPECT_EQ(TAVOServiceThirdPartyAll("stop"), 3);
     EXPECT_THAT(ScriptEvents(), ElementsAre("30three.sh stop", "20two.sh stop", "10one.sh stop"));
     for (const char *action : {"", "reload", "start; reboot", static_cast<const char *>(nullptr)}) {
-        EXPECT_EQ(TAVOServiceThirdPartyAll(action), -1);
-        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_third_party_all"}));
+        EXPECT_EQ(FaultOf(TAVOServiceThirdPartyAll(action)), (Fault{ERR_BAD_PARAMETERS, "service_third_party_all"}));
     }
     EXPECT_THAT(ScriptEvents(), IsEmpty());
     std::filesystem::remove_all(folder);
@@ -155,8 +148,7 @@ TEST(ServiceDisableSet, WritesTheKeyAlone)
     EXPECT_EQ(Setting("runweb"), "no");
     EXPECT_THAT(ScriptCalls(), IsEmpty());
     for (const int share : {0, 8, 12}) {
-        EXPECT_EQ(TAVOServiceDisableSet(share), -1) << share;
-        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "service_disable_set"}));
+        EXPECT_EQ(FaultOf(TAVOServiceDisableSet(share)), (Fault{ERR_BAD_PARAMETERS, "service_disable_set"})) << share;
     }
 }
 
@@ -172,12 +164,10 @@ TEST(ServiceHandlers, RefuseNoRowAndNoSuchAction)
     };
     for (const auto &[id, act] : actions) {
         EXPECT_EQ(TAVOServiceInfoGet(id)->pfAction, act) << id;
-        EXPECT_EQ(act(nullptr, TAVO_SERVICE_START), -1) << id;
-        EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+        EXPECT_EQ(FaultOf(act(nullptr, TAVO_SERVICE_START)).code, ERR_BAD_PARAMETERS) << id;
         for (const int action : {-1, 7}) {
             test::ForgetFault();
-            EXPECT_EQ(act(TAVOServiceInfoGet(id), action), -1) << id;
-            EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS) << id;
+            EXPECT_EQ(FaultOf(act(TAVOServiceInfoGet(id), action)).code, ERR_BAD_PARAMETERS) << id;
         }
     }
     const std::pair<int, TAVOSERVICESTATUS> statuses[] = {

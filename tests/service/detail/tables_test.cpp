@@ -82,17 +82,6 @@ TEST(ServiceTables, ArePrintedInThePage)
     }
 }
 
-TEST(ServiceTables, RecordLayout)
-{
-    EXPECT_EQ(sizeof(TAVOSERVICESHARE), 420u);
-    EXPECT_EQ(offsetof(TAVOSERVICESHARE, szShare), 8u);
-    EXPECT_EQ(offsetof(TAVOSERVICESHARE, szVolumePath), 216u);
-    EXPECT_EQ(offsetof(TAVOSERVICESHARE, szShareName), 268u);
-    EXPECT_EQ(offsetof(TAVOSERVICESHARE, fSupported), 396u);
-    EXPECT_EQ(offsetof(TAVOSERVICESHARE, fSpecialVolume), 416u);
-    EXPECT_EQ(offsetof(TAVOSERVICE, rgShareId), sizeof(void *) == 4 ? 28u : 52u);
-}
-
 TEST(Volumes, ReadFromTheMounts)
 {
     const auto volumes = tavo::ParseVolumes("proc /proc proc rw 0 0\n"
