@@ -17,6 +17,7 @@
 using findhostd::Host;
 using findhostd::HostTable;
 using findhostd::PacketKind;
+using namespace std::string_literals;
 
 namespace {
 
@@ -30,31 +31,33 @@ Host MakeHost(const std::string &name, const char *address = "192.0.2.7")
     return host;
 }
 
-std::vector<uint8_t> Bytes(const std::string &text)
-{
-    return {text.begin(), text.end()};
-}
-
 PacketKind Kind(const std::string &text, Host *host = nullptr)
 {
     Host ignored{};
-    const auto bytes = Bytes(text);
-    return findhostd::ReadPacket(bytes, host ? *host : ignored);
+    return findhostd::ReadPacket(std::vector<uint8_t>(text.begin(), text.end()), host ? *host : ignored);
+}
+
+std::string Record(char type, const std::string &body)
+{
+    return std::string{type, static_cast<char>(body.size())} + body;
 }
 
 const std::string kHeader = "\x12\x34\x56\x78TAVO";
-const std::string kReplyKind("\x01\x04\x02\x00\x00\x00", 6);
-const std::string kModel("\x10\x04\x04\x03\x02\x01", 6);
-const std::string kProtocol("\x11\x04\xF0\x00\x00\x00", 6);
-const std::string kName("\x12\x03nas", 5);
-const std::string kAddress("\x13\x04\xC0\x00\x02\x07", 6);
+const std::string kReplyKind = Record(0x01, "\x02\0\0\0"s);
+const std::string kModel = Record(0x10, "\x04\x03\x02\x01");
+const std::string kProtocol = Record(0x11, "\xF0\0\0\0"s);
+const std::string kName = Record(0x12, "nas");
+const std::string kAddress = Record(0x13, "\xC0\0\x02\x07"s);
+const std::string kWhole = kHeader + kReplyKind + kModel + kProtocol + kName + kAddress;
 
 TEST(Packet, OursAreTheseBytes)
 {
     std::array<uint8_t, findhostd::kLargestPacket> packet;
     const size_t size = findhostd::WriteReply(MakeHost("nas"), packet);
     EXPECT_EQ(std::string(packet.begin(), packet.begin() + size),
-              kHeader + kReplyKind + kModel + kProtocol + kName + kAddress);
+              "\x12\x34\x56\x78TAVO\x01\x04\x02\0\0\0\x10\x04\x04\x03\x02\x01\x11\x04\xF0\0\0\0\x12\x03nas"s +
+                  "\x13\x04\xC0\0\x02\x07"s);
+    EXPECT_EQ(std::string(packet.begin(), packet.begin() + size), kWhole);
 }
 
 TEST(Packet, EveryQueryOfTheLibraryIsOne)
@@ -69,7 +72,7 @@ TEST(Packet, EveryQueryOfTheLibraryIsOne)
 TEST(Packet, ARepliesRecordsComeInAnyOrder)
 {
     Host host{};
-    const std::string unknown("\xA4\x04\x00\x00\x02\x01\x77\x00", 8);
+    const std::string unknown = Record('\xA4', "\0\0\x02\x01"s) + Record(0x77, "");
     EXPECT_EQ(Kind(kHeader + kAddress + unknown + kName + kProtocol + kModel + kReplyKind, &host), PacketKind::reply);
     const Host expected = MakeHost("nas");
     EXPECT_EQ(std::memcmp(&host, &expected, sizeof host), 0);
@@ -77,82 +80,63 @@ TEST(Packet, ARepliesRecordsComeInAnyOrder)
 
 TEST(Packet, RejectsIncompleteAndInvalidPackets)
 {
-    const std::string whole = kHeader + kReplyKind + kModel + kProtocol + kName + kAddress;
     const auto with = [&](const std::string &part, const std::string &instead) {
-        std::string text = whole;
+        std::string text = kWhole;
         return text.replace(text.find(part), part.size(), instead);
     };
-    ASSERT_EQ(Kind(whole), PacketKind::reply);
+    const auto named = [&](const std::string &name) {
+        return with(kName, Record(0x12, name));
+    };
+    const auto addressed = [&](const std::string &address) {
+        return with(kAddress, Record(0x13, address));
+    };
+    ASSERT_EQ(Kind(kWhole), PacketKind::reply);
+    const std::string long_record = Record(0x77, std::string(255, 'x'));
     const struct {
         const char *what;
         std::string bytes;
     } rows[] = {
-        {"empty", ""},
-        {"half a header", kHeader.substr(0, 7)},
-        {"another tag", "\x12\x34\x56\x78OVAT" + whole.substr(8)},
-        {"a record without a length", whole + "\x77"},
-        {"a record longer than the packet", whole + std::string("\x77\x05"
-                                                                "abcd")},
+        {"another tag", "\x12\x34\x56\x78OVAT" + kWhole.substr(8)},
+        {"a record without a length", kWhole + "\x77"},
+        {"a record longer than the packet", kWhole + "\x77\x05" + "abcd"},
         {"no model", with(kModel, "")},
         {"no protocol", with(kProtocol, "")},
         {"no name", with(kName, "")},
-        {"no address", with(kAddress, "")},
-        {"model 0", with(kModel, std::string("\x10\x04\0\0\0\0", 6))},
-        {"protocol 239", with(kProtocol, std::string("\x11\x04\xEF\0\0\0", 6))},
-        {"a model of three bytes", with(kModel, std::string("\x10\x03\x01\0\0", 5))},
-        {"two names", whole + kName},
-        {"a kind that is none", with(kReplyKind, std::string("\x01\x04\x03\0\0\0", 6))},
-        {"query and reply", whole + std::string("\x01\x04\x01\0\0\0", 6)},
-        {"an empty name", with(kName, std::string("\x12\0", 2))},
-        {"a comma", with(kName, std::string("\x12\x03"
-                                            "a,b",
-                                            5))},
-        {"a line feed", with(kName, std::string("\x12\x03"
-                                                "a\nb",
-                                                5))},
-        {"a NUL", with(kName, std::string("\x12\x03"
-                                          "a\0b",
-                                          5))},
-        {"an escape", with(kName, std::string("\x12\x03\x1B[m", 5))},
-        {"a control of the second set", with(kName, "\x12\x03"
-                                                    "a\xC2\x9B")},
-        {"a mark of direction", with(kName, "\x12\x04"
-                                            "a\xE2\x80\xAE")},
-        {"an isolate", with(kName, "\x12\x04"
-                                   "a\xE2\x81\xA6")},
-        {"the Arabic mark", with(kName, "\x12\x03"
-                                        "a\xD8\x9C")},
-        {"a line separator", with(kName, "\x12\x04"
-                                         "a\xE2\x80\xA8")},
-        {"Latin 1", with(kName, "\x12\x02"
-                                "a\xE4")},
-        {"half a character", with(kName, "\x12\x03"
-                                         "a\xE2\x80")},
-        {"an overlong slash", with(kName, "\x12\x03"
-                                          "a\xC0\xAF")},
-        {"a surrogate", with(kName, "\x12\x04"
-                                    "a\xED\xA0\x80")},
-        {"beyond Unicode", with(kName, "\x12\x05"
-                                       "a\xF4\x90\x80\x80")},
-        {"another's address", with(kName, "\x12\x0F"
-                                          "nas(192.0.2.10)")},
-        {"a blank at the end", with(kName, std::string("\x12\x02"
-                                                       "a ",
-                                                       4))},
-        {"64 bytes", with(kName, std::string("\x12\x40", 2) + std::string(64, 'a'))},
-        {"loopback", with(kAddress, std::string("\x13\x04\x7F\0\0\x01", 6))},
-        {"a multicast address", with(kAddress, std::string("\x13\x04\xE0\0\0\x01", 6))},
-        {"no address at all", with(kAddress, std::string("\x13\x04\0\0\0\0", 6))},
-        {"too large", whole + std::string("\x77\xFF", 2) + std::string(255, 'x') + std::string("\x77\xFF", 2) +
-                          std::string(255, 'x')},
+        {"model 0", with(kModel, Record(0x10, "\0\0\0\0"s))},
+        {"protocol 239", with(kProtocol, Record(0x11, "\xEF\0\0\0"s))},
+        {"a model of three bytes", with(kModel, Record(0x10, "\x01\0\0"s))},
+        {"two names", kWhole + kName},
+        {"an invalid kind", with(kReplyKind, Record(0x01, "\x03\0\0\0"s))},
+        {"query and reply", kWhole + Record(0x01, "\x01\0\0\0"s)},
+        {"an empty name", named("")},
+        {"a comma", named("a,b")},
+        {"a line feed", named("a\nb")},
+        {"a NUL", named("a\0b"s)},
+        {"an escape", named("\x1B[m")},
+        {"a control of the second set", named("a\xC2\x9B")},
+        {"a mark of direction", named("a\xE2\x80\xAE")},
+        {"an isolate", named("a\xE2\x81\xA6")},
+        {"the Arabic mark", named("a\xD8\x9C")},
+        {"a line separator", named("a\xE2\x80\xA8")},
+        {"Latin 1", named("a\xE4")},
+        {"half a character", named("a\xE2\x80")},
+        {"an overlong slash", named("a\xC0\xAF")},
+        {"a surrogate", named("a\xED\xA0\x80")},
+        {"beyond Unicode", named("a\xF4\x90\x80\x80")},
+        {"another's address", named("nas(192.0.2.10)")},
+        {"a blank at the end", named("a ")},
+        {"64 bytes", named(std::string(64, 'a'))},
+        {"loopback", addressed("\x7F\0\0\x01"s)},
+        {"a multicast address", addressed("\xE0\0\0\x01"s)},
+        {"no address at all", addressed("\0\0\0\0"s)},
+        {"too large", kWhole + long_record + long_record},
     };
     for (const auto &row : rows)
         EXPECT_EQ(Kind(row.bytes), PacketKind::other) << row.what;
-    for (size_t size = 0; size < whole.size(); ++size)
-        EXPECT_EQ(Kind(whole.substr(0, size)), PacketKind::other) << size;
-    EXPECT_EQ(Kind(with(kName, "\x12\x3F" + std::string(63, 'a'))), PacketKind::reply);
-    for (const char *name : {"\x12\x02\xC3\xA4", "\x12\x03\xE2\x82\xAC", "\x12\x04\xF0\x9F\x98\x80"})
-        EXPECT_EQ(Kind(with(kName, name)), PacketKind::reply) << "UTF-8";
+    for (size_t size = 0; size < kWhole.size(); ++size)
+        EXPECT_EQ(Kind(kWhole.substr(0, size)), PacketKind::other) << size;
+    for (const std::string &name : {std::string(63, 'a'), "\xC3\xA4"s, "\xE2\x82\xAC"s, "\xF0\x9F\x98\x80"s})
+        EXPECT_EQ(Kind(named(name)), PacketKind::reply) << name;
 }
 
 std::string Flooder(int i)
