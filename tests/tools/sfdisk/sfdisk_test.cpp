@@ -2,10 +2,13 @@
 #include "support/appliance_root.h"
 #include "support/running_program.h"
 #include "support/scratch_dir.h"
+#include "support/text_lines.h"
 
 #include <gmock/gmock.h>
 
 #include <cstdint>
+#include <iterator>
+#include <sstream>
 #include <string>
 #include <vector>
 
@@ -33,9 +36,11 @@ class Sfdisk : public testing::Test {
         ::close(fd);
     }
 
-    // Runs it on the image.
-    test::Ran Run(test::Words words)
+    // Runs it on the image, with words that have no blanks in them.
+    test::Ran Run(const std::string &line)
     {
+        std::istringstream in(line);
+        test::Words words{std::istream_iterator<std::string>(in), {}};
         words.push_back(image_);
         return test::RunningProgram("/sbin/sfdisk", words).Wait();
     }
@@ -57,9 +62,9 @@ class Sfdisk : public testing::Test {
     }
 
     // The list without the name of the image.
-    std::string List(std::vector<std::string> words = {"-l", "-uS"})
+    std::string List(const std::string &line = "-l -uS")
     {
-        std::string text = Run(words).out;
+        std::string text = Run(line).out;
         for (size_t at; (at = text.find(image_)) != text.npos;)
             text.erase(at, image_.size());
         return text;
@@ -68,6 +73,12 @@ class Sfdisk : public testing::Test {
     test::ScratchDir dir_;
     std::string image_ = dir_ / "disk";
 };
+
+// Makes an entry empty, as the library does it.
+std::string Emptying(int number)
+{
+    return "-N" + std::to_string(number) + " -q -f --no-reread -o0 -z0 -t0 -F -D";
+}
 
 std::string Entry(std::initializer_list<unsigned char> bytes)
 {
@@ -91,24 +102,23 @@ std::string SmallEntry(unsigned char type, unsigned char start, unsigned char co
 TEST_F(Sfdisk, MakesAndUnmakesTheLayoutOfASystemDisk)
 {
     PutSector(0, std::string(512, 'x'));
-    EXPECT_EQ(Run({"-M1"}).status, 0);
+    EXPECT_EQ(Run("-M1").status, 0);
     EXPECT_EQ(Sector(), Table({})) << "nothing of what stood there is left";
-    EXPECT_EQ(Run({"-N1", "-uS", "-q", "-f", "-j256", "-z4980480", "-tfd", "-F"}).status, 0);
-    EXPECT_EQ(Run({"-N2", "-uS", "-q", "-f", "-j0", "-z4194304", "-tfd", "-F"}).status, 0);
-    EXPECT_EQ(Run({"-N3", "-uS", "-q", "-f", "-j262144", "-z-1", "-tfd", "-F"}).status, 0);
+    EXPECT_EQ(Run("-N1 -uS -q -f -j256 -z4980480 -tfd -F").status, 0);
+    EXPECT_EQ(Run("-N2 -uS -q -f -j0 -z4194304 -tfd -F").status, 0);
+    EXPECT_EQ(Run("-N3 -uS -q -f -j262144 -z-1 -tfd -F").status, 0);
     EXPECT_EQ(List(), "1 256 4980735 4980480 fd Linux raid autodetect\n"
                       "2 4980736 9175039 4194304 fd Linux raid autodetect\n"
                       "3 9437184 16777215 7340032 fd Linux raid autodetect\n");
-    EXPECT_EQ(List({"-l", "-uS", "-N2"}), "2 4980736 9175039 4194304 fd Linux raid autodetect\n");
+    EXPECT_EQ(List("-l -uS -N2"), "2 4980736 9175039 4194304 fd Linux raid autodetect\n");
     // Cylinder, head and sector as every other tool writes them: 0/4/5 for sector 256, 310/9/19 for 4980735.
     EXPECT_EQ(Sector().substr(446, 16), Entry({0, 4, 5, 0, 0xFD, 9, 0x53, 0x36, 0, 1, 0, 0, 0, 0xFF, 0x4B, 0}));
 
-    EXPECT_EQ(Run({"-N3", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0);
-    EXPECT_EQ(Run({"-N3", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0) << "empty already";
-    EXPECT_EQ(Run({"-N5", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 1) << "no such thing";
-    const test::Ran absent = Run({"-l", "-uS", "-N3"});
-    EXPECT_EQ(absent.status, 1);
-    EXPECT_EQ(absent.out + absent.err, "");
+    EXPECT_EQ(Run(Emptying(3)).status, 0);
+    EXPECT_EQ(Run(Emptying(3)).status, 0) << "empty already";
+    EXPECT_EQ(Run(Emptying(5)).status, 1) << "no such thing";
+    const test::Ran absent = Run("-l -uS -N3");
+    EXPECT_EQ(std::to_string(absent.status) + absent.out + absent.err, "1");
     EXPECT_EQ(Sector().substr(478, 32), std::string(32, '\0'));
     struct stat facts;
     ASSERT_EQ(::stat(image_.c_str(), &facts), 0);
@@ -121,65 +131,80 @@ TEST_F(Sfdisk, ChangesNothingButTheEntry)
     before.replace(0, 446, std::string(446, 'b'));
     before[446] = '\x80';
     PutSector(0, before);
-    EXPECT_EQ(Run({"-N2", "-j4", "-z2", "-tee", "-q"}).status, 0);
+    EXPECT_EQ(Run("-N2 -j4 -z2 -tee -q").status, 0);
     std::string after = Sector();
     EXPECT_EQ(after.substr(478 - 16 + 8, 8), Entry({20, 0, 0, 0, 2, 0, 0, 0}));
     after.replace(462, 16, before, 462, 16);
     EXPECT_EQ(after, before);
 }
 
+constexpr off_t kSectorsOf3Tb = 5860533168;
+
 TEST_F(Sfdisk, RefusesWhatDoesNotFit)
 {
+    constexpr off_t guid = kSectorsOf3Tb * 512;  // so large a disk gets a GUID table
     const struct {
         off_t bytes;
-        std::vector<std::string> words;
+        const char *line;
         const char *complaint;
     } rows[] = {
-        {kGiB, {"-N1", "-j0", "-z10", "-t83"}, "cover the partition table"},
-        {kGiB, {"-N1", "-j2097152", "-z-1", "-t83"}, "start beyond"},
-        {kGiB, {"-N1", "-j1", "-z2097152", "-t83"}, "reach beyond"},
-        {kGiB, {"-N1", "-j1", "-z18446744073709551615", "-t83"}, "reach beyond"},
-        {kGiB, {"-N1", "-j18446744073709551615", "-z1", "-t83"}, "start beyond"},
-        {kGiB, {"-N4", "-o107", "-z10", "-t83"}, "overlap partition 3"},
-        {kGiB, {"-N4", "-o95", "-z10", "-t83"}, "overlap partition 3"},
-        {kGiB, {"-N4", "-o90", "-z100", "-t83"}, "overlap partition 3"},
-        {4096 * kGiB, {"-N1", "-o4294967296", "-z1", "-t83"}, "sector 2^32"},
-        {4096 * kGiB, {"-N1", "-o4294967295", "-z2", "-t83"}, "sector 2^32"},
-        {kGiB, {"-N5", "-j1", "-z1", "-t83"}, "only partitions 1 to 4"},
-        {kGiB, {"-N1", "-j1", "-z1", "-tf"}, "extended partitions"},
+        {kGiB, "-N1 -j0 -z10 -t83", "cover the partition table"},
+        {kGiB, "-N1 -j2097152 -z-1 -t83", "start beyond"},
+        {kGiB, "-N1 -j1 -z2097152 -t83", "reach beyond"},
+        {kGiB, "-N1 -j1 -z18446744073709551615 -t83", "reach beyond"},
+        {kGiB, "-N1 -j18446744073709551615 -z1 -t83", "start beyond"},
+        {kGiB, "-N4 -o107 -z10 -t83", "overlap partition 3"},
+        {kGiB, "-N4 -o95 -z10 -t83", "overlap partition 3"},
+        {kGiB, "-N4 -o90 -z100 -t83", "overlap partition 3"},
+        {4096 * kGiB, "-N1 -o4294967296 -z1 -t83", "sector 2^32"},
+        {4096 * kGiB, "-N1 -o4294967295 -z2 -t83", "sector 2^32"},
+        {kGiB, "-N5 -j1 -z1 -t83", "only partitions 1 to 4"},
+        {kGiB, "-N1 -j1 -z1 -tf", "extended partitions"},
+        {guid, "-N1 -j33 -z10 -t83", "cover the partition table"},
+        {guid, "-N1 -j5860533135 -z-1 -t83", "start beyond"},
+        {guid, "-N1 -j5860533134 -z2 -t83", "reach beyond"},
+        {guid, "-N1 -j200 -z18446744073709551615 -t83", "reach beyond"},
+        {guid, "-N4 -o107 -z10 -t83", "overlap partition 3"},
+        {guid, "-N5 -j1 -z1 -t83", "only partitions 1 to 4"},
+        {guid, "-N1 -j200 -z1 -tf", "extended partitions"},
+        {guid, "-N1 -j200 -z1 -t8e", "types fd, 82 and 83"},
     };
-    const std::string table = Table({"", "", SmallEntry(0x83, 100, 8)});
     for (const auto &row : rows) {
         Resize(row.bytes);
-        PutSector(0, table);
-        const test::Ran result = Run(row.words);
+        PutSector(0, Table({"", "", SmallEntry(0x83, 100, 8)}));
+        if (row.bytes == guid) {
+            ASSERT_EQ(Run("-M1").status, 0);
+            ASSERT_EQ(Run("-N3 -o100 -z8 -t83").status, 0);
+        }
+        const std::string before = Sector(0) + Sector(1) + Sector(2);
+        const test::Ran result = Run(row.line);
         EXPECT_EQ(result.status, 1) << row.complaint;
         EXPECT_THAT(result.err, testing::HasSubstr(row.complaint));
-        EXPECT_EQ(Sector(), table);
+        EXPECT_EQ(Sector(0) + Sector(1) + Sector(2), before) << row.line;
+        EXPECT_EQ(Run("-N4 -o108 -z10 -t83").status, 0) << "right behind it";
     }
-    EXPECT_EQ(Run({"-N4", "-o108", "-z10", "-t83"}).status, 0) << "right behind it";
 
+    Resize(0);
+    Resize(kGiB);
     PutSector(0, Table({SmallEntry(0xEE, 1, 255)}));
-    EXPECT_THAT(Run({"-N2", "-j1", "-z1", "-t83"}).err, testing::HasSubstr("GUID"));
+    EXPECT_THAT(Run("-N2 -j1 -z1 -t83").err, testing::HasSubstr("GUID"));
     PutSector(0, std::string(512, '\0'));
-    EXPECT_THAT(Run({"-N1", "-j1", "-z1", "-t83"}).err, testing::HasSubstr("no partition table"));
-    EXPECT_EQ(Run({"-l"}).status, 1);
-    EXPECT_EQ(Run({"-l", "-N1"}).err, "") << "that a blank disk lacks a partition is an answer";
+    EXPECT_THAT(Run("-N1 -j1 -z1 -t83").err, testing::HasSubstr("no partition table"));
+    EXPECT_EQ(Run("-l").status, 1);
+    EXPECT_EQ(Run("-l -N1").err, "") << "that a blank disk lacks a partition is an answer";
 }
 
 TEST_F(Sfdisk, TheRestOfALargeDiskEndsWhereNumbersEnd)
 {
     Resize(4096 * kGiB);
     PutSector(0, Table({}));  // its kind stays
-    const test::Ran loud = Run({"-N1", "-j256", "-z-1", "-t83"});
+    const test::Ran loud = Run("-N1 -j256 -z-1 -t83");
     EXPECT_EQ(loud.status, 0);
     EXPECT_THAT(loud.err, testing::HasSubstr("2^32"));
     EXPECT_EQ(List(), "1 256 4294967295 4294967040 83 Linux\n");
     EXPECT_EQ(Sector().substr(451, 3), "\xFE\xFF\xFF");
-    EXPECT_EQ(Run({"-N1", "-j256", "-z-1", "-t83", "-q"}).err, "");
+    EXPECT_EQ(Run("-N1 -j256 -z-1 -t83 -q").err, "");
 }
-
-constexpr uint64_t kSectorsOf3Tb = 5860533168;
 
 // Whatever other people use finds nothing to complain about.
 void ExpectSound(const std::string &image)
@@ -203,84 +228,61 @@ void ExpectSound(const std::string &image)
 TEST_F(Sfdisk, WritesAGuidTableToLargeDisks)
 {
     const struct {
-        uint64_t sectors;
-        const char *start, *gap;
-        const char *first;  // lines
-    } rows[] = {
-        {(uint64_t{1} << 32) + 1, "-j256", "-j262144", "1 256 4980735 4980480 fd Linux raid autodetect\n"},
-        {kSectorsOf3Tb, "-j256", "-j262144", "1 256 4980735 4980480 fd Linux raid autodetect\n"},
-        {kSectorsOf3Tb, "-j63", "-j262144", "1 63 4980542 4980480 fd Linux raid autodetect\n"},
-        {uint64_t{8} << 31, "-j256", "-j262144", "1 256 4980735 4980480 fd Linux raid autodetect\n"},
-        {uint64_t{40} << 31, "-j256", "-j16002", "1 256 4980735 4980480 fd Linux raid autodetect\n"},
-    };
+        off_t sectors, start, gap;
+    } rows[] = {{(off_t{1} << 32) + 1, 256, 262144},
+                {kSectorsOf3Tb, 256, 262144},
+                {kSectorsOf3Tb, 63, 262144},
+                {off_t{8} << 31, 256, 262144},
+                {off_t{40} << 31, 256, 16002}};
     for (const auto &row : rows) {
-        if (::truncate(image_.c_str(), 0) != 0 ||
-            ::truncate(image_.c_str(), static_cast<off_t>(row.sectors * 512)) != 0)
+        if (::truncate(image_.c_str(), 0) != 0 || ::truncate(image_.c_str(), row.sectors * 512) != 0)
             continue;  // the file system, or a 32-bit kernel, ends before
         PutSector(0, std::string(512, 'x'));
-        EXPECT_EQ(Run({"-M1"}).status, 0);
-        EXPECT_EQ(Run({"-l"}).out, "");
-        EXPECT_EQ(Run({"-N1", "-uS", "-q", "-f", row.start, "-z4980480", "-tfd", "-F"}).status, 0);
-        EXPECT_EQ(Run({"-N2", "-uS", "-q", "-f", "-j0", "-z4194304", "-t82", "-F"}).status, 0);
-        const test::Ran last = Run({"-N3", "-uS", "-q", "-f", row.gap, "-z-1", "-t83", "-F"});
-        EXPECT_EQ(last.status, 0);
-        EXPECT_EQ(last.out + last.err, "");
-        const uint64_t start = std::stoull(row.start + 2) + 4980480 + 4194304 + std::stoull(row.gap + 2);
-        const uint64_t end = row.sectors - 34;  // the copy of the table
-        EXPECT_EQ(List({"-l", "-N1"}), row.first);
-        EXPECT_EQ(List({"-l", "-uS", "-N3"}), "3 " + std::to_string(start) + " " + std::to_string(end) + " " +
-                                                  std::to_string(end - start + 1) + " 83 Linux\n");
-        EXPECT_THAT(List({"-l", "-uS", "-N2"}), testing::EndsWith(" 4194304 82 Linux swap\n"));
+        EXPECT_EQ(Run("-M1").status, 0);
+        EXPECT_EQ(Run("-l").out, "");
+        EXPECT_EQ(Run("-N1 -uS -q -f -z4980480 -tfd -F -j" + std::to_string(row.start)).status, 0);
+        EXPECT_EQ(Run("-N2 -uS -q -f -j0 -z4194304 -t82 -F").status, 0);
+        const test::Ran rest = Run("-N3 -uS -q -f -z-1 -t83 -F -j" + std::to_string(row.gap));
+        EXPECT_EQ(std::to_string(rest.status) + rest.out + rest.err, "0");
+        const auto line = [](const char *number, off_t first, off_t last, const char *type) {
+            return number + std::to_string(first) + " " + std::to_string(last) + " " +
+                   std::to_string(last - first + 1) + type;
+        };
+        EXPECT_EQ(List("-l -N1"), line("1 ", row.start, row.start + 4980479, " fd Linux raid autodetect\n"));
+        EXPECT_EQ(List("-l -uS -N3"),
+                  line("3 ", row.start + 4980480 + 4194304 + row.gap, row.sectors - 34, " 83 Linux\n"))
+            << "up to the copy of the table";
+        EXPECT_THAT(List("-l -uS -N2"), testing::EndsWith(" 4194304 82 Linux swap\n"));
         EXPECT_EQ(Sector().substr(446 + 4, 1), "\xEE") << "the protective table";
         ExpectSound(image_);
-        EXPECT_EQ(Run({"-N3", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0);
-        EXPECT_EQ(Run({"-N3", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0) << "empty";
-        EXPECT_EQ(Run({"-N15", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 1);
-        EXPECT_EQ(List({"-l", "-N3"}), "");
+        EXPECT_EQ(Run(Emptying(3)).status, 0);
+        EXPECT_EQ(Run(Emptying(3)).status, 0) << "empty";
+        EXPECT_EQ(Run(Emptying(15)).status, 1);
+        EXPECT_EQ(List("-l -N3"), "");
         ExpectSound(image_);
     }
 }
 
-TEST_F(Sfdisk, RefusesWhatDoesNotFitAGuidTable)
+TEST_F(Sfdisk, RepairsADamagedCopyOfAGuidTable)
 {
-    Resize(static_cast<off_t>(kSectorsOf3Tb * 512));
-    ASSERT_EQ(Run({"-M1"}).status, 0);
-    ASSERT_EQ(Run({"-N3", "-o100", "-z8", "-t83"}).status, 0);
-    const struct {
-        std::vector<std::string> words;
-        const char *complaint;
-    } rows[] = {
-        {{"-N1", "-j33", "-z10", "-t83"}, "cover the partition table"},
-        {{"-N1", "-j5860533135", "-z-1", "-t83"}, "start beyond"},
-        {{"-N1", "-j5860533134", "-z2", "-t83"}, "reach beyond"},
-        {{"-N1", "-j200", "-z18446744073709551615", "-t83"}, "reach beyond"},
-        {{"-N4", "-o107", "-z10", "-t83"}, "overlap partition 3"},
-        {{"-N5", "-j1", "-z1", "-t83"}, "only partitions 1 to 4"},
-        {{"-N1", "-j200", "-z1", "-tf"}, "extended partitions"},
-        {{"-N1", "-j200", "-z1", "-t8e"}, "types fd, 82 and 83"},
-    };
-    const std::string before = Sector(1) + Sector(2);
-    for (const auto &row : rows) {
-        const test::Ran result = Run(row.words);
-        EXPECT_EQ(result.status, 1) << row.complaint;
-        EXPECT_THAT(result.err, testing::HasSubstr(row.complaint));
-        EXPECT_EQ(Sector(1) + Sector(2), before);
-    }
-    EXPECT_EQ(Run({"-N4", "-o108", "-z10", "-tfd"}).status, 0);
-    EXPECT_EQ(Run({"-N3", "-o34", "-z8", "-tfd"}).status, 0) << "in its own place";
+    Resize(kSectorsOf3Tb * 512);
+    ASSERT_EQ(Run("-M1").status, 0);
+    ASSERT_EQ(Run("-N3 -o100 -z8 -t83").status, 0);
+    EXPECT_EQ(Run("-N4 -o108 -z10 -tfd").status, 0);
+    EXPECT_EQ(Run("-N3 -o34 -z8 -tfd").status, 0) << "in its own place";
     EXPECT_EQ(List(), "3 34 41 8 fd Linux raid autodetect\n4 108 117 10 fd Linux raid autodetect\n");
 
     // The first copy is damaged: the second one is read, and both are whole after the next change.
     PutSector(1, std::string(512, 'r'));
-    EXPECT_EQ(List({"-l", "-N4"}), "4 108 117 10 fd Linux raid autodetect\n");
-    EXPECT_EQ(Run({"-N3", "-q", "-f", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0);
+    EXPECT_EQ(List("-l -N4"), "4 108 117 10 fd Linux raid autodetect\n");
+    EXPECT_EQ(Run("-N3 -q -f -o0 -z0 -t0 -F -D").status, 0);
     ExpectSound(image_);
     // Both: nothing is changed, and an empty table makes the disk usable.
     PutSector(1, std::string(512, 'r'));
-    PutSector(static_cast<off_t>(kSectorsOf3Tb) - 1, std::string(512, 'r'));
-    EXPECT_THAT(Run({"-N1", "-j200", "-z1", "-t83"}).err, testing::HasSubstr("damaged GUID"));
-    EXPECT_EQ(List({"-l", "-N4"}), "");
-    EXPECT_EQ(Run({"-M1"}).status, 0);
+    PutSector(kSectorsOf3Tb - 1, std::string(512, 'r'));
+    EXPECT_THAT(Run("-N1 -j200 -z1 -t83").err, testing::HasSubstr("damaged GUID"));
+    EXPECT_EQ(List("-l -N4"), "");
+    EXPECT_EQ(Run("-M1").status, 0);
     ExpectSound(image_);
 }
 
@@ -293,10 +295,10 @@ TEST_F(Sfdisk, ChangesTheKindOfTableForAnEmptyOneAlone)
     ASSERT_EQ(test::RunningProgram(peer, {"--clear", "--new=2:4096:8191", "--typecode=2:ef00", image_}).Wait().status,
               0);
     EXPECT_EQ(List(), "2 4096 8191 4096 ef Unknown\n");
-    EXPECT_EQ(Run({"-N1", "-o2048", "-z1024", "-t83"}).status, 0);
-    EXPECT_EQ(List({"-l", "-N1"}), "1 2048 3071 1024 83 Linux\n");
+    EXPECT_EQ(Run("-N1 -o2048 -z1024 -t83").status, 0);
+    EXPECT_EQ(List("-l -N1"), "1 2048 3071 1024 83 Linux\n");
     ExpectSound(image_);
-    ASSERT_EQ(Run({"-M1"}).status, 0);
+    ASSERT_EQ(Run("-M1").status, 0);
     EXPECT_EQ(Sector(0), Table({}));
     EXPECT_EQ(Sector(1), std::string(512, '\0')) << "or it would come back";
     EXPECT_EQ(Sector(8 * kGiB / 512 - 1), std::string(512, '\0'));
@@ -309,7 +311,7 @@ TEST_F(Sfdisk, WritesNoRemarkOnTheDisk)
 {
     Resize(4096 * kGiB);
     PutSector(0, Table({}));
-    ASSERT_EQ(Run({"-N1", "-j256", "-z-1", "-t83"}).status, 0);
+    ASSERT_EQ(Run("-N1 -j256 -z-1 -t83").status, 0);
     std::vector<std::string> expected;
     for (off_t sector = 0; sector < 4; ++sector)
         expected.push_back(Sector(sector));
@@ -325,49 +327,25 @@ TEST_F(Sfdisk, WritesNoRemarkOnTheDisk)
 TEST_F(Sfdisk, RefusesWhatItDoesNotKnow)
 {
     const std::string before = Sector();
-    const std::vector<std::string> lines[] = {
-        {"-d"},
-        {"-l", "-uM"},
-        {"-A1"},
-        {"-M2"},
-        {"-M1", "-N1"},
-        {"-M1", "-l"},
-        {"-l", "-z1"},
-        {"-N1"},
-        {"-N0", "-z1", "-t83", "-j1"},
-        {"-N1x", "-z1", "-t83", "-j1"},
-        {"-N1", "-z1", "-t83"},
-        {"-N1", "-z1", "-j1"},
-        {"-N1", "-z1", "-j1", "-t0"},
-        {"-N1", "-z1", "-j1", "-t100"},
-        {"-N1", "-z1", "-j1", "-tgg"},
-        {"-N1", "-z-2", "-j1", "-t83"},
-        {"-N1", "-z1", "-j-1", "-t83"},
-        {"-N1", "-z1", "-j1", "-o1", "-t83"},
-        {"-N1", "-z1", "-j", "-t83"},
-        {"-N1", "-z18446744073709551616", "-j1", "-t83"},
-        {"-N1", "-z0", "-t83"},
-        {"--delete"},
-        {"-lq"},
-        {"-F"},
-        {},
-        {"-l", "/dev/null"},
-    };
-    for (const auto &words : lines) {
-        const test::Ran result = Run(words);
-        EXPECT_EQ(result.status, 2) << testing::PrintToString(words);
+    for (const std::string &line : test::Lines(
+             "-d\n-l -uM\n-A1\n-M2\n-M1 -N1\n-M1 -l\n-l -z1\n-N1\n-N0 -z1 -t83 -j1\n-N1x -z1 -t83 -j1\n-N1 -z1 -t83\n"
+             "-N1 -z1 -j1\n-N1 -z1 -j1 -t0\n-N1 -z1 -j1 -t100\n-N1 -z1 -j1 -tgg\n-N1 -z-2 -j1 -t83\n-N1 -z1 -j-1 -t83\n"
+             "-N1 -z1 -j1 -o1 -t83\n-N1 -z1 -j -t83\n-N1 -z18446744073709551616 -j1 -t83\n-N1 -z0 -t83\n--delete\n-lq\n"
+             "-F\n\n-l /dev/null")) {
+        const test::Ran result = Run(line);
+        EXPECT_EQ(result.status, 2) << line;
         EXPECT_THAT(result.err, testing::StartsWith("sfdisk: "));
     }
     EXPECT_EQ(Sector(), before);
-    EXPECT_EQ(Run({"--help"}).status, 0);
+    EXPECT_EQ(Run("--help").status, 0);
     const std::string image = image_;
     for (const char *no_disk : {"/dev/null", "/tmp", "/nowhere"}) {
         image_ = no_disk;
-        EXPECT_EQ(Run({"-M1"}).status, 1) << no_disk;
+        EXPECT_EQ(Run("-M1").status, 1) << no_disk;
     }
     image_ = dir_ / "fifo";
     ASSERT_EQ(::mkfifo(image_.c_str(), 0600), 0);
-    EXPECT_EQ(Run({"-M1"}).status, 1) << "and does not wait";
+    EXPECT_EQ(Run("-M1").status, 1) << "and does not wait";
     image_ = image;
 }
 
@@ -380,10 +358,10 @@ TEST_F(Sfdisk, ListsAndEmptiesLogicalPartitions)
     EXPECT_EQ(List(),
               "1 8 15 8 83 Linux\n2 32 127 96 f Win95 Ext'd (LBA)\n5 34 43 10 83 Linux\n6 67 77 11 82 Linux swap\n"
               "7 100 111 12 8e Linux LVM\n");
-    EXPECT_EQ(Run({"-N6", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 0);
-    EXPECT_EQ(List({"-l", "-N6"}), "6 100 111 12 8e Linux LVM\n") << "the last moves up, as the kernel counts";
+    EXPECT_EQ(Run(Emptying(6)).status, 0);
+    EXPECT_EQ(List("-l -N6"), "6 100 111 12 8e Linux LVM\n") << "the last moves up, as the kernel counts";
     EXPECT_EQ(Sector(0), Table({SmallEntry(0x83, 8, 8), SmallEntry(0x0F, 32, 96)}));
-    EXPECT_EQ(Run({"-N7", "-q", "-f", "--no-reread", "-o0", "-z0", "-t0", "-F", "-D"}).status, 1);
+    EXPECT_EQ(Run(Emptying(7)).status, 1);
     PutSector(32, std::string(512, 'r'));
     EXPECT_EQ(List(), "1 8 15 8 83 Linux\n2 32 127 96 f Win95 Ext'd (LBA)\n") << "a broken chain ends there";
 }
