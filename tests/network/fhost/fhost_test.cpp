@@ -5,7 +5,7 @@
 #include "network/net/cards.h"
 #include "support/appliance_root.h"
 #include "support/own_child.h"
-#include "support/string_hash.h"
+#include "support/owned_container.h"
 
 #include <chrono>
 #include <functional>
@@ -276,7 +276,7 @@ TEST_F(Discovery, RemovesForeignFilesAtTheListPath)
 
 TEST_F(Discovery, TheListIsReadLineByLine)
 {
-    test::StringHash hosts;
+    test::Owned<TLIBSZHASH> hosts = test::HashOf({});
     WriteFile(kTaken, "1,240,host,10.0.0.5,x\n"
                       "  2,239,old,10.0.0.6,x  \n"
                       "0,240,nomodel,10.0.0.7,x\n"
@@ -287,17 +287,17 @@ TEST_F(Discovery, TheListIsReadLineByLine)
                       "1,240,host,10.0.0.5,again\n"
                       "1,240,liar,10.0.0.5;x,x\n"
                       "1,240,\x1B[2J,10.0.0.10,x");
-    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts.Addr()), 3);
+    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts), 3);
     // Showing the names safely is the reader's affair.
-    EXPECT_EQ(hosts.All(), (test::Pairs{{"host(10.0.0.5)", "10.0.0.5"},
-                                        {"other(10.0.0.9)", "10.0.0.9"},
-                                        {"\x1B[2J(10.0.0.10)", "10.0.0.10"}}));
+    EXPECT_EQ(test::Pairs(hosts), (test::PairMap{{"host(10.0.0.5)", "10.0.0.5"},
+                                                 {"other(10.0.0.9)", "10.0.0.9"},
+                                                 {"\x1B[2J(10.0.0.10)", "10.0.0.10"}}));
     EXPECT_EQ(log_.Take(), "fhost_get2_hash:# model number == 0\nfhost_get2_hash:# model number == 0\n"
                            "fhost_get2_hash:# field number < 5\nfhost_get2_hash:# field number < 5\n"
                            "fhost_get2_hash:# not an address");
     EXPECT_FALSE(std::filesystem::exists(kTaken));
 
-    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts.Addr()), 0);
+    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts), 0);
     EXPECT_EQ(LastFault(), (test::Fault{ERR_OPEN_FAILED, "fhost_get2_hash"}));
     EXPECT_EQ(TAVOFHOSTGet2Hash(nullptr), -1);
     EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
@@ -305,31 +305,31 @@ TEST_F(Discovery, TheListIsReadLineByLine)
 
 TEST_F(Discovery, AHashThatMustGrowStaysTheCallers)
 {
-    test::StringHash hosts;
+    test::Owned<TLIBSZHASH> hosts = test::HashOf({});
     std::string list;
     for (int i = 0; i < 2000; ++i)
         list += "1,240," + std::string(250, 'n') + std::to_string(i) + ",10.0." + std::to_string(i / 200) + "." +
                 std::to_string(i % 200 + 1) + ",x\n";
     WriteFile(kTaken, list);
-    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts.Addr()), 2000);
+    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts), 2000);
 }
 
 TEST_F(Discovery, AListThatIsNotOursIsNotRead)
 {
-    test::StringHash hosts;
+    test::Owned<TLIBSZHASH> hosts = test::HashOf({});
     test::ScratchDir elsewhere;
     const std::string secret = elsewhere / "list";
     WriteFile(secret, "1,240,host,10.0.0.5,x\n");
     std::filesystem::create_symlink(secret, kTaken);
-    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts.Addr()), 0);
+    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts), 0);
     EXPECT_EQ(TLIBErrGet(), ERR_OPEN_FAILED);
     std::filesystem::remove(kTaken);
     ASSERT_EQ(::mkfifo(kTaken, 0666), 0);
-    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts.Addr()), 0) << "and it does not wait";
+    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts), 0) << "and it does not wait";
     std::filesystem::remove(kTaken);
     WriteFile(kTaken, "1,240,host,10.0.0.5,x\n");
     if (::chown(kTaken, 1000, 1000) == 0) {
-        EXPECT_EQ(TAVOFHOSTGet2Hash(hosts.Addr()), 0) << "another user's";
+        EXPECT_EQ(TAVOFHOSTGet2Hash(hosts), 0) << "another user's";
     }
     EXPECT_TRUE(std::filesystem::exists(secret));
 }
