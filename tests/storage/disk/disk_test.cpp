@@ -127,7 +127,6 @@ TEST_F(Disk, EmptyBaysAndFailures)
     EXPECT_EQ(sectors, 2u);
     EXPECT_EQ(DiskIsExist("/dev/sdc"), 1);
     EXPECT_EQ(DiskIsExist("/dev/sdb"), 0);
-    EXPECT_EQ(DiskIsExist(nullptr), -1);
 }
 
 TEST_F(Disk, EnumHasTheBaysInOrderThenTheUnits)
