@@ -4,6 +4,8 @@
 #include "tavo_appliance.h"
 #include "tavo_partition.h"
 
+#include "frame/files.h"
+
 #include <algorithm>
 #include <iterator>
 
