@@ -263,6 +263,7 @@ TEST(HashDump, ShowsPairsAndRemovedOnes)
     testing::internal::CaptureStdout();
     TLIBIHashDump(hash.get());
     const std::string text = testing::internal::GetCapturedStdout();
+    EXPECT_THAT(text, testing::HasSubstr("address \nslots[0] empty\n"));
     EXPECT_THAT(text, testing::HasSubstr("slots[4] a=1\nslots[5] removed\nslots[6] empty\n"));
     EXPECT_THAT(text, testing::HasSubstr("nStrSize =512 \t nStrFree =504 \t nSlot =31 \t nPair =1 \t"));
 }

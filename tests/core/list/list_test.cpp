@@ -83,6 +83,7 @@ TEST(ListInsert, FoldsBeyondAscii)
     EXPECT_EQ(Insert(folded, 0, "B"), 1);
     EXPECT_THAT(Items(folded.get()), ElementsAre("A", "B", "b", "C", "Ä"));
     EXPECT_EQ(TLIBSzListCaseFind(folded.get(), "ä"), 4);
+    EXPECT_EQ(TLIBSzListCaseFind(MakeList({"c", "b", "a"}).get(), "C"), 0) << "not in order: from the front";
 }
 
 TEST(ListSort, OnlyAnUnsortedListIsSorted)
