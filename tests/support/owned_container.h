@@ -21,8 +21,10 @@ using PairMap = std::map<std::string, std::string>;
 inline Hash MakeHash(const PairMap &pairs, int string_bytes = 512)
 {
     Hash hash(PshTLIBSzHashAlloc(string_bytes));
-    for (const auto &[key, value] : pairs)
-        EXPECT_GE(Moving(hash, [&](auto **addr) { return TLIBSzHashSetValue(addr, key.c_str(), value.c_str()); }), 0);
+    for (const auto &pair : pairs) {
+        const char *key = pair.first.c_str(), *value = pair.second.c_str();
+        EXPECT_GE(Moving(hash, [&](auto **addr) { return TLIBSzHashSetValue(addr, key, value); }), 0);
+    }
     return hash;
 }
 

@@ -16,7 +16,7 @@ namespace every_call {
 // A text, and room for one.
 template <size_t kSize>
 struct Text {
-    char text[kSize] = "";
+    char text[kSize] = {};
 
     operator char *() { return text; }
     void ShowIn(Trial &run) const { run.Show(std::string_view(text)); }
