@@ -105,6 +105,7 @@ TEST_F(Refusals, Core)
     Refuses("sys_remove", TLIBSysRemove, "/none");
     Refuses("str_decode_colon", TLIBStrDecodeColon, "a", {MayBeNull(), text}, {64, -1});
     Refuses("str_encode_colon", TLIBStrEncodeColon, "a", text, {64, -1});
+    Refuses("str_trim_space", TLIBStrTrimSpace, text, {MayBeNull(), text});
     Refuses("unicode_utf8_str_upper", TLIBUnicodeUTF8StrUpper, "a", text, {64, -1});
     Refuses("unicode_utf8_str_count_char", TLIBUnicodeUTF8StrCountChar, {"a", "\xff"});
     Refuses("list_case_find", TLIBSzListCaseFind, list_, "a");
