@@ -2,6 +2,7 @@
 #include "run_tavoctl.h"
 #include "support/machine.h"
 
+#include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
 
 namespace {
@@ -63,6 +64,32 @@ TEST_F(MachineTavoctl, ShowsTheDisks)
     test::Happen("pull 2");
     EXPECT_EQ(Facts({"disk", "list"}).at(1).at("state"), "empty");
     EXPECT_EQ(Tavoctl({"disk", "info", "sdb"}).status, 3);
+}
+
+TEST_F(MachineTavoctl, TestsADriveAndReadsItsErrors)
+{
+    const std::string tested = "smartctl -l selftest /dev/sda | grep -c '^# *[0-9]' || true";
+    EXPECT_EQ(Told(tested), "0\n");
+    Succeeds({"disk", "test", "--short", "--wait", "sda"});
+    Succeeds({"disk", "test", "--long", "sda"});
+    EXPECT_EQ(Told(tested), "2\n");
+    EXPECT_EQ(Facts({"disk", "health", "sda"}).at(0).at("self_test"), "passed");
+    EXPECT_EQ(Facts({"disk", "health", "sda"}).at(0).at("errors"), 0);
+    EXPECT_EQ(Facts({"disk", "errors", "sda"}), json::array());
+
+    // A drive that works on a test, and then cannot read.
+    const std::string failing = "LD_PRELOAD=" TEST_FAILING_DRIVE " tavoctl disk ";
+    const test::CommandResult result = Shell(failing + "test --short --wait sda");
+    EXPECT_EQ(result.status, 1);
+    EXPECT_THAT(result.output, testing::HasSubstr("the test failed: it cannot read"));
+    EXPECT_EQ(Told("cat /tmp/asked"), "test 1\nrunning\nrunning\nfailed\n");
+    const json health = json::parse(Shell(failing + "health --json sda").output).at("items").at(0);
+    EXPECT_EQ(health.at("verdict"), "failing");
+    EXPECT_EQ(health.at("errors"), 1);
+    const json error = json::parse(Shell(failing + "errors --json sda").output).at("items").at(0);
+    EXPECT_EQ(error.at("error"), "the sector cannot be read");
+    EXPECT_EQ(error.at("sector"), 4711);
+    Told("rm -f /tmp/asked");
 }
 
 TEST_F(MachineTavoctl, BringsADiskFromBlankToVolumeAndBack)

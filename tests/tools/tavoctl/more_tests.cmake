@@ -15,8 +15,11 @@ add_test(NAME tavoctl_schemas COMMAND ${folder}/schemas $<TARGET_PROPERTY:tavoct
     ${TAVO_ENTER} ${TAVO_ENTER_OPTIONS} --)
 set_tests_properties(tavoctl_schemas PROPERTIES TIMEOUT 300)
 
-# Disks that say that they sleep, for tavoctl and the tools that it runs in the virtual appliance.
-add_library(sleepy_drives MODULE ${folder}/preload/sleepy_drives.cpp)
-target_compile_options(sleepy_drives PRIVATE -U_TIME_BITS -U_FILE_OFFSET_BITS)
-target_compile_definitions(tools_tavoctl_test PRIVATE TEST_SLEEPY_DRIVES="$<TARGET_FILE:sleepy_drives>")
-add_dependencies(tools_tavoctl_test sleepy_drives)
+# Disks that say that they sleep, and one that fails, for tavoctl and the tools that it runs in the virtual appliance.
+foreach(drives sleepy_drives failing_drive)
+    add_library(${drives} MODULE ${folder}/preload/${drives}.cpp)
+    target_compile_options(${drives} PRIVATE -U_TIME_BITS -U_FILE_OFFSET_BITS)
+    string(TOUPPER ${drives} name)
+    target_compile_definitions(tools_tavoctl_test PRIVATE TEST_${name}="$<TARGET_FILE:${drives}>")
+    add_dependencies(tools_tavoctl_test ${drives})
+endforeach()

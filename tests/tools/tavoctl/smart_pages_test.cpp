@@ -46,6 +46,59 @@ TEST(SmartPages, SelfTestsTellTheirStateAndHowLongTheyTake)
     }
 }
 
+// An entry of the log: the registers after the command failed, and the hours.
+void Enter(unsigned char (&page)[512], int slot, unsigned char error, unsigned char sector, unsigned char hours)
+{
+    unsigned char *const entry = page + 2 + 90 * slot;
+    entry[55] = 0xC8;
+    entry[61] = error;
+    entry[63] = sector;
+    entry[64] = 2;
+    entry[65] = 3;
+    entry[66] = 0xE4;
+    entry[88] = hours;
+    entry[89] = 1;
+}
+
+TEST(SmartPages, TheErrorLogIsARing)
+{
+    unsigned char page[512] = {};
+    page[0] = 1;
+    EXPECT_TRUE(tavoctl::ParseErrorLog(page).last.empty());
+    // Seven errors in five slots: the seventh is in the second.
+    const unsigned char errors[] = {0x84, 0x40, 0x10, 0x04, 0x01};
+    for (int slot = 0; slot < 5; ++slot)
+        Enter(page, slot, errors[slot], static_cast<unsigned char>(slot), static_cast<unsigned char>(10 + slot));
+    page[1] = 2;
+    page[452] = 7;
+    const tavoctl::ErrorLog log = tavoctl::ParseErrorLog(page);
+    EXPECT_EQ(log.count, 7);
+    const struct {
+        int number, hours;
+        const char *error;
+        unsigned sector;
+    } rows[] = {
+        {7, 267, "the sector cannot be read", 0x4030201},
+        {6, 266, "data was damaged on the cable", 0x4030200},
+        {5, 270, "not known", 0x4030204},
+        {4, 269, "the drive refused the command", 0x4030203},
+        {3, 268, "the sector is not found", 0x4030202},
+    };
+    ASSERT_EQ(log.last.size(), std::size(rows));
+    for (std::size_t i = 0; i < std::size(rows); ++i) {
+        EXPECT_EQ(log.last[i].number, rows[i].number) << i;
+        EXPECT_EQ(log.last[i].hours, rows[i].hours) << i;
+        EXPECT_EQ(log.last[i].error, rows[i].error) << i;
+        EXPECT_EQ(log.last[i].sector, rows[i].sector) << i;
+        EXPECT_EQ(log.last[i].command, 0xC8) << i;
+    }
+    // Fewer than there are slots, and a number that no slot has.
+    page[452] = 1;
+    EXPECT_EQ(tavoctl::ParseErrorLog(page).last.size(), 1u);
+    page[1] = 6;
+    EXPECT_TRUE(tavoctl::ParseErrorLog(page).last.empty());
+}
+
 TEST(SmartPages, TheWorstFactDecidesTheVerdict)
 {
     const SmartAttribute good = {9, 100, 100, 0, 12345};

@@ -215,6 +215,12 @@ its threshold, or a self-test failed), with exit status 1. A disk in standby is 
 
 tavoctl disk health
 tavoctl disk health --json sda sdb)");
+    disk.Add("errors", reads, Answer::List(error_columns), DiskErrors,
+             R"(Lists the last five errors that a disk has written down
+itself, the newest first. A disk in standby is not read unless --wake is given.
+
+tavoctl disk errors sda
+tavoctl disk errors --wake --json sdb)");
     disk.Add("test", changes, DiskTest, R"(Starts the drive's own test, which goes on in the background while the
 disk is used. `disk health` shows how far it is and what came of it.
 

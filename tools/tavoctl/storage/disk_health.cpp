@@ -32,14 +32,38 @@ SelfTest ReadSelfTest(const std::string &disk, const std::string &attempted)
     return ParseSelfTest(page);
 }
 
-// SMART EXECUTE OFF-LINE IMMEDIATE, which the drive does by itself.
-void Command(const std::string &disk, unsigned char test, const std::string &attempted)
+struct Smart {
+    unsigned char command = 0xB0;
+    unsigned char number;  // of the test or the log
+    unsigned char feature;
+    unsigned char pages;
+    unsigned char page[512];
+};
+
+constexpr unsigned char execute_off_line = 0xD4;
+constexpr unsigned char read_log = 0xD5;
+
+void Send(const std::string &disk, Smart &request, const std::string &attempted)
 {
-    unsigned char words[4] = {0xB0, test, 0xD4, 0};
     const Descriptor drive(TAVOIDiskRawOpen(disk.c_str()));
     Must(drive.IsOpen(), attempted);
-    if (::ioctl(drive.Get(), HDIO_DRIVE_CMD, words) != 0)
+    if (::ioctl(drive.Get(), HDIO_DRIVE_CMD, &request) != 0)
         throw SystemFailure(attempted, errno);
+}
+
+// The drive does it by itself.
+void RunTest(const std::string &disk, unsigned char test, const std::string &attempted)
+{
+    Smart request = {.number = test, .feature = execute_off_line, .pages = 0, .page = {}};
+    Send(disk, request, attempted);
+}
+
+ErrorLog ReadErrors(const std::string &disk, const std::string &attempted)
+{
+    constexpr unsigned char summary = 1;
+    Smart request = {.number = summary, .feature = read_log, .pages = 1, .page = {}};
+    Send(disk, request, attempted);
+    return ParseErrorLog(request.page);
 }
 
 void WaitForTest(const std::string &disk, const std::string &attempted)
@@ -80,6 +104,12 @@ DiskHealth ReadHealth(const std::string &disk, bool wake)
             health.hours = *raw & hours;
     } catch (const Failure &failure) {
         health.reason = failure.reason;
+        return health;
+    }
+    try {
+        health.errors = ReadErrors(disk, attempted).count;
+    } catch (const Failure &) {
+        // Not every drive keeps a log.
     }
     return health;
 }
@@ -98,6 +128,18 @@ Action DiskHealthList(Arguments &in)
             std::any_of(disks.begin(), disks.end(), [](const DiskHealth &disk) { return disk.verdict == "failing"; });
         if (fails)
             call.status = exit_failed;
+    };
+}
+
+Action DiskErrors(Arguments &in)
+{
+    const auto word = in.Text("DISK", disk_kind, disk_help);
+    const auto wake = in.Flag("--wake", wake_help);
+    return [=](Call &call) {
+        const std::string disk = DiskPath(*word);
+        const std::string attempted = "read the error log of " + disk;
+        RefuseToWake(disk, *wake, attempted);
+        call.List(error_columns, ReadErrors(disk, attempted).last);
     };
 }
 
@@ -124,7 +166,7 @@ Action DiskTest(Arguments &in)
             call.Tell("minutes", minutes > 0 ? std::optional(minutes) : std::nullopt);
         }
         if (call.Proceed())
-            Command(disk, *stop ? stop_test : *quick ? short_test : long_test, attempted);
+            RunTest(disk, *stop ? stop_test : *quick ? short_test : long_test, attempted);
         if (*wait && !call.dry_run)
             WaitForTest(disk, attempted);
     };

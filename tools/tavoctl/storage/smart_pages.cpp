@@ -1,6 +1,8 @@
 // The health of a drive from its pages.
 #include "storage/smart_pages.h"
 
+#include <algorithm>
+
 namespace tavoctl {
 namespace {
 
@@ -40,6 +42,36 @@ constexpr const char *results[] = {
 };
 constexpr int first_failure = 3;
 
+// The error log: a ring of five entries, each with the last commands and then the registers of the failed one.
+constexpr std::size_t newest_error_at = 1;  // from 1; 0 for none
+constexpr std::size_t error_count_at = 452;
+constexpr int error_entries = 5;
+constexpr std::size_t error_entry_size = 90;
+constexpr std::size_t failed_command = 55;
+constexpr std::size_t error_registers = 60;
+
+int Word(const unsigned char *bytes)
+{
+    return bytes[0] | bytes[1] << 8;
+}
+
+const char *ErrorText(unsigned char error)
+{
+    constexpr struct {
+        int bit;
+        const char *text;
+    } texts[] = {
+        {0x80, "data was damaged on the cable"},
+        {0x40, "the sector cannot be read"},
+        {0x10, "the sector is not found"},
+        {0x04, "the drive refused the command"},
+    };
+    for (const auto &[bit, text] : texts)
+        if (error & bit)
+            return text;
+    return "not known";
+}
+
 }  // namespace
 
 SelfTest ParseSelfTest(const unsigned char (&page)[512])
@@ -57,6 +89,27 @@ SelfTest ParseSelfTest(const unsigned char (&page)[512])
                             ? page[long_minutes_word] | page[long_minutes_word + 1] << 8
                             : page[long_minutes_at];
     return test;
+}
+
+ErrorLog ParseErrorLog(const unsigned char (&page)[512])
+{
+    ErrorLog log = {.count = Word(page + error_count_at), .last = {}};
+    const int newest = page[newest_error_at];
+    if (newest < 1 || newest > error_entries)
+        return log;
+    for (int i = 0; i < std::min(log.count, error_entries); ++i) {
+        const int slot = (newest - 1 - i + error_entries) % error_entries;
+        const unsigned char *entry = page + 2 + static_cast<std::size_t>(slot) * error_entry_size;
+        const unsigned char *registers = entry + error_registers;
+        const uint64_t sector =
+            static_cast<uint64_t>(registers[6] & 15) << 24 | registers[5] << 16 | registers[4] << 8 | registers[3];
+        log.last.push_back({.number = log.count - i,
+                            .hours = Word(registers + 28),
+                            .error = ErrorText(registers[1]),
+                            .sector = sector,
+                            .command = entry[failed_command]});
+    }
+    return log;
 }
 
 std::optional<uint64_t> RawOf(const std::vector<SmartAttribute> &attributes, int id)

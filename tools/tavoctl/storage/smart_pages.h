@@ -4,6 +4,7 @@
 
 #include "storage/smart.h"
 
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <vector>
@@ -19,6 +20,20 @@ struct SelfTest {
     int short_minutes, long_minutes;  // that one takes; 0: not known
 };
 SelfTest ParseSelfTest(const unsigned char (&page)[512]);
+
+// One of the last errors that a drive has written down.
+struct DriveError {
+    int number;  // counted by the drive
+    int hours;   // that it had been on
+    std::string error;
+    uint64_t sector;
+    int command;  // of ATA
+};
+struct ErrorLog {
+    int count;                     // of all errors so far
+    std::vector<DriveError> last;  // up to five, the newest first
+};
+ErrorLog ParseErrorLog(const unsigned char (&page)[512]);
 
 // The verdict on a drive and its reason: "failing", "worn" or "good".
 struct Verdict {
