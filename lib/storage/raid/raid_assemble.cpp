@@ -6,17 +6,21 @@
 #include "storage/detail/array_name.h"
 #include "storage/detail/mdadm_examine.h"
 #include "storage/detail/partition_command.h"
+#include "storage/detail/reshape.h"
 
 extern "C" int RAIDAssemble(const char *szPath, const char *szUuid)
 {
-    if (!tavo::IsArrayPath(szPath) || !szUuid || !tavo::IsArrayUuid(szUuid)) {
+    const auto number = szPath ? tavo::ArrayNumber(szPath) : std::nullopt;
+    if (!number || !szUuid || !tavo::IsArrayUuid(szUuid)) {
         LogError("%s:%d Bad parameters");
         return Fail(ERR_BAD_PARAMETERS);
     }
     return Guard([&] {
         const auto result = tavo::RunDiskCommand("/sbin/mdadm -A %s -u %s > /dev/null 2>&1", szPath, szUuid);
-        if (result.status == 0)
+        if (result.status == 0) {
+            tavo::GoOnReshaping(*number);
             return 0;
+        }
         LogError("%s:%d Failed to do '%s', err=%d", result.command, result.status);
         return -1;
     });

@@ -9,6 +9,7 @@
 #include "storage/detail/mdadm_examine.h"
 #include "storage/detail/open_disk.h"
 #include "storage/detail/partition_command.h"
+#include "storage/detail/reshape.h"
 
 #include <string>
 #include <vector>
@@ -79,14 +80,18 @@ extern "C" int RAIDAssembleByInfo(const RAIDINFO *pInfo)
         const std::string members = AllMembers(*pInfo);
         auto result =
             tavo::RunDiskCommand("/sbin/mdadm -A %s%s > /dev/null 2>&1", pInfo->szPath, tavo::ComposedPiece{members});
-        if (result.status == 0)
+        if (result.status == 0) {
+            tavo::GoOnReshaping(*number);
             return 0;
+        }
         const Remaining remaining = Look(*pInfo);
         LetGo(*pInfo, *number);
         if (remaining.status == RAID_STATUS_DEGRADED) {
             result = tavo::RunDiskCommand("/sbin/mdadm -A %s -u %s > /dev/null 2>&1", pInfo->szPath, remaining.uuid);
-            if (result.status == 0)
+            if (result.status == 0) {
+                tavo::GoOnReshaping(*number);
                 return 0;
+            }
         }
         LogError("%s:%d Failed to do '%s', err=%d", result.command, result.status);
         return -1;

@@ -273,6 +273,30 @@ TEST_P(MachineArrays, Raid5BecomesRaid6)
     EXPECT_EQ(RAIDMigrate2RAID6(ReadArray("/dev/md2").get(), test::MakeList({"/dev/sde"}).get()), -1);
 }
 
+TEST_P(MachineArrays, AReshapeGoesOnWhenItsArrayIsStartedAgain)
+{
+    ASSERT_EQ(Make({.path = "/dev/md2",
+                    .level = RAID_LEVEL_5,
+                    .members = {"/dev/sda", "/dev/sdb", "/dev/sdc"},
+                    .sync = false}),
+              0);
+    Told("dd if=/dev/urandom of=/dev/md2 bs=1M count=32 conv=fsync");
+    const std::string sum = Told("head -c 32M /dev/md2 | md5sum");
+    Told("tavoctl raid speed --least 100 --most 500 md2; tavoctl raid grow --yes md2 sdd; sleep 1");
+    const std::string uuid = UuidOf("/dev/md2");
+    ASSERT_EQ(RAIDStop("/dev/md2"), 0);
+    ASSERT_EQ(RAIDAssemble("/dev/md2", uuid.c_str()), 0);
+    EXPECT_EQ(Told("timeout 60 head -c 32M /dev/md2 | md5sum"), sum);
+    Told("tavoctl raid speed --most 200000 md2 && tavoctl raid wait md2");
+    EXPECT_EQ(ReadArray("/dev/md2")->nSlot, 4);
+    EXPECT_EQ(Told("head -c 32M /dev/md2 | md5sum"), sum);
+    // Another one would have to overwrite what has not been moved yet.
+    const test::CommandResult refused = Shell("tavoctl raid grow --yes md2 sde");
+    EXPECT_EQ(refused.status, 1);
+    EXPECT_THAT(refused.output, HasSubstr("has 2012 KiB of room before its data, and it takes 2048"));
+    EXPECT_EQ(MembersOf("/dev/md2", ~0).size(), 4u);
+}
+
 TEST_P(MachineArrays, RoomOnTheMembersIsSeen)
 {
     ASSERT_EQ(

@@ -592,6 +592,30 @@ TEST_F(Raid, AssemblesWhatIsLeftOfTheMembers)
     }
 }
 
+// Readers of an array in the middle of a reshape, which the kernel has started for reading only, wait for its first write.
+TEST_F(Raid, AReshapeThatWasInterruptedGoesOn)
+{
+    const std::string uuid = "b7e9ed0e:bf1ea758:5bf5fba6:7c359649";
+    RAIDMEMBER member = {"/dev/sda3", 1, nullptr};
+    const RAIDINFO info = Record(RAID_LEVEL_5, &member);
+    const std::string goes_on = "/bin/echo active > /sys/block/md5/md/array_state";
+    const struct {
+        const char *state, *position;
+        bool changes;
+    } rows[] = {{"read-auto\n", "30720\n", true}, {"read-auto\n", "none\n", false}, {"clean\n", "30720\n", false}};
+    for (const auto &row : rows) {
+        tree_.Put("/sys/block/md5/md/array_state", row.state);
+        tree_.Put("/sys/block/md5/md/reshape_position", row.position);
+        commands_.Exit(0);
+        for (const bool by_info : {false, true}) {
+            EXPECT_EQ(by_info ? RAIDAssembleByInfo(&info) : RAIDAssemble("/dev/md5", uuid.c_str()), 0);
+            const std::vector<std::string> commands = commands_.Take();
+            EXPECT_EQ(commands.size(), row.changes ? 2u : 1u) << row.state << row.position;
+            EXPECT_EQ(commands.back() == goes_on, row.changes) << row.state << row.position;
+        }
+    }
+}
+
 TEST_F(Raid, AddsOnlyMembersThatAreLargeEnough)
 {
     RAIDINFO info = Record(RAID_LEVEL_5);

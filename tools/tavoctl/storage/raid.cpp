@@ -196,9 +196,9 @@ tavoctl raid remove md2 sdd3
 tavoctl raid remove md3)");
     raid.Add("grow", changes | destroys, RaidGrow, R"(Makes an array in order larger: by new MEMBERs, over which
 its data is spread in the background, or without MEMBER to all the room that its members have, after each of them was
-replaced by a larger one. A RAID 5 or 6 that uses less than
-1 GiB of each member takes no more. What is on new members is lost; one that is in use or too small is refused. Then `volume grow`
-has the volume on it use the room.
+replaced by a larger one. What is on new members is lost; one that is in use or too small is refused, and so is a RAID 5
+or 6 with so little room before its data that a power failure meanwhile could damage it. Then `volume grow` has the volume
+on it use the room.
 
 tavoctl raid grow --wait md2 sde3
 tavoctl raid grow md2)");

@@ -8,6 +8,9 @@
 #include "storage/system_tool.h"
 
 #include <algorithm>
+#include <cstdlib>
+#include <numeric>
+#include <string_view>
 
 namespace tavoctl {
 namespace {
@@ -75,14 +78,41 @@ void GrowMembers(Call &call, const RAIDINFO &array, const std::string &attempted
         call.report.changes.clear();
 }
 
+// KiB between the superblock and the data of a member.
+uint64_t RoomBeforeData(const std::string &member)
+{
+    constexpr std::string_view label = "Unused Space : before=";
+    const std::string text = TryTool({"/sbin/mdadm", "-E", member}).output;
+    const std::size_t at = text.find(label);
+    return at == text.npos ? 0 : std::strtoull(text.c_str() + at + label.size(), nullptr, 10) / 2;
+}
+
+// Spread over more members, data moves towards their beginning. With enough room there it never moves onto what has not been
+// moved yet. Without it mdadm keeps a copy of the first stripes meanwhile; when the power fails before that is written, the
+// array does not start any more.
+void RefuseUnsafeReshape(const RAIDINFO &array, int old_slots, int new_slots, const std::string &attempted)
+{
+    if (array.fLevel != RAID_LEVEL_5 && array.fLevel != RAID_LEVEL_6)
+        return;
+    const int parity = RAIDParityDiskCount(array.fLevel, old_slots);
+    const int data = old_slots - parity;
+    const auto chunk =
+        std::strtoull(KernelText(ArrayFile(array.szPath, "chunk_size")).value_or("").c_str(), nullptr, 10);
+    const uint64_t needed = chunk / 1024 * static_cast<uint64_t>(std::lcm(data, new_slots - parity) / data);
+    for (const std::string &member : Members(array, ~0)) {
+        const uint64_t room = RoomBeforeData(member);
+        FailIf(room < needed, attempted,
+               member + " has " + std::to_string(room) + " KiB of room before its data, and it takes " +
+                   std::to_string(needed) + " to survive a power failure meanwhile",
+               "make a new array");
+    }
+}
+
 void GrowSlots(Call &call, const RAIDINFO &array, const std::vector<std::string> &paths, const std::string &attempted)
 {
-    // On members of 48 MiB, which leave little room before the data, a power failure at the start of this lost data.
-    constexpr uint64_t least = uint64_t{1} << 30;
     const std::string name = array.szPath;
     const int slots = array.nSlot + static_cast<int>(paths.size());
-    FailIf(array.fLevel != RAID_LEVEL_1 && array.cbMember < least, attempted,
-           "it uses less than 1 GiB of each member, and a power failure meanwhile could damage it", "make a new array");
+    RefuseUnsafeReshape(array, array.nSlot, slots, attempted);
     RefuseTwice(paths, attempted);
     RefuseUsed(paths, attempted);
     RefuseTooLarge(SizeToBe(array.fLevel, {}, slots, array.cbMember), attempted);

@@ -97,6 +97,14 @@ StoppedArray FindStopped(const std::string &path, const std::string &uuid, bool 
     return found[0];
 }
 
+// Readers of an array in the middle of a reshape wait as long as the kernel holds it for reading only.
+void GoOn(const std::string &path, const std::string &attempted)
+{
+    if (KernelText(ArrayFile(path, "array_state")) == "read-auto" &&
+        KernelText(ArrayFile(path, "reshape_position")).value_or("none") != "none")
+        SetKernelText(ArrayFile(path, "array_state"), "active", attempted);
+}
+
 // Everything that its members have, whatever they say of each other.
 void ForceStart(Call &call, const std::string &path, const StoppedArray &array)
 {
@@ -118,8 +126,21 @@ void ForceStart(Call &call, const std::string &path, const StoppedArray &array)
     if (!call.Proceed("Start " + path + " nevertheless?"))
         return;
     LetGo(path);
-    RunTool({"/sbin/mdadm", "-A", path, "--force", "--run", "-u", array.uuid}, attempted);
+    const ToolResult careful = TryTool({"/sbin/mdadm", "-A", "-v", path, "-u", array.uuid});
     if (!Runs(path)) {
+        LetGo(path);
+        // The power failed after a reshape was asked for and before the copy of its first stripes was written that mdadm
+        // looks for: nothing was moved.
+        if (careful.output.find("Failed to find backup of critical section") != std::string::npos &&
+            careful.output.find("No backup metadata on") != std::string::npos)
+            RunTool({"/sbin/mdadm", "-A", path, "--update=revert-reshape", "--invalid-backup", "-u", array.uuid},
+                    attempted);
+        else
+            RunTool({"/sbin/mdadm", "-A", path, "--force", "--run", "-u", array.uuid}, attempted);
+    }
+    if (Runs(path)) {
+        GoOn(path, attempted);
+    } else {
         LetGo(path);
         throw Failure{.attempted = attempted, .reason = ShortOf(array), .hint = log_hint};
     }
