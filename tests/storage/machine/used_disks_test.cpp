@@ -275,6 +275,25 @@ TEST_P(MachineUsedDisks, LeavesAForeignStickAlone)
     test::Happen("pull usb");
 }
 
+TEST_P(MachineUsedDisks, AMountedDiskStaysAsItIs)
+{
+    // What it held may still have a superblock at the beginning, which a file system leaves alone.
+    RAIDSUPERBLOCK superblock = {};
+    RAIDSBGet("/dev/sde", &superblock);
+    Told("mkfs.ext4 -q -F /dev/sde && mkdir -p /mnt/disk && mount -o ro,noload /dev/sde /mnt/disk");
+    const std::string sum = "blockdev --flushbufs /dev/sde && sha256sum /dev/sde";
+    const std::string before = Told(sum);
+    for (const int parts : {PARTITION_SYSTEM, PARTITION_DATA, PARTITION_SYSTEM | PARTITION_DATA})
+        EXPECT_EQ(PartitionClean("/dev/sde", parts), -1) << parts;
+    EXPECT_EQ(PartitionCreate("/dev/sde", PARTITION_SYSTEM, nullptr), -1);
+    EXPECT_NE(RAIDSBClean("/dev/sde"), 0);
+    if (superblock.szUuid[0])
+        RAIDSBCleanByUUID(nullptr, superblock.szUuid);
+    LVMCleanIllegal();
+    EXPECT_EQ(Told(sum), before);
+    Told("umount /mnt/disk && e2fsck -f -n /dev/sde");
+}
+
 // Sectors of 4,096 bytes: every geometry of ours counts in 512.
 TEST_P(MachineUsedDisks, OtherSectorsAreRefusedBeforeAnythingIsWritten)
 {
