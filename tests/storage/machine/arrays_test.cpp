@@ -293,7 +293,7 @@ TEST_P(MachineArrays, AReshapeGoesOnWhenItsArrayIsStartedAgain)
     // Another one would have to overwrite what has not been moved yet.
     const test::CommandResult refused = Shell("tavoctl raid grow --yes md2 sde");
     EXPECT_EQ(refused.status, 1);
-    EXPECT_THAT(refused.output, HasSubstr("has 2012 KiB of room before its data, and it takes 2048"));
+    EXPECT_THAT(refused.output, HasSubstr("has 476 KiB of room before its data, and it takes 2048"));
     EXPECT_EQ(MembersOf("/dev/md2", ~0).size(), 4u);
 }
 
