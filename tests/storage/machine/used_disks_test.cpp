@@ -284,7 +284,7 @@ TEST_P(MachineUsedDisks, AMountedDiskStaysAsItIs)
     Told("mkfs.ext4 -q -F /dev/sde && mkdir -p /mnt/disk && mount -o ro,noload /dev/sde /mnt/disk");
     const std::string sum = "blockdev --flushbufs /dev/sde && sha256sum /dev/sde";
     const std::string before = Told(sum);
-    for (const int parts : {PARTITION_SYSTEM, PARTITION_DATA, PARTITION_SYSTEM | PARTITION_DATA})
+    for (const int parts : {+PARTITION_SYSTEM, +PARTITION_DATA, PARTITION_SYSTEM | PARTITION_DATA})
         EXPECT_EQ(PartitionClean("/dev/sde", parts), -1) << parts;
     EXPECT_EQ(PartitionCreate("/dev/sde", PARTITION_SYSTEM, nullptr), -1);
     EXPECT_NE(RAIDSBClean("/dev/sde"), 0);
