@@ -13,6 +13,16 @@ namespace {
 
 using Clock = std::chrono::steady_clock;
 
+// A member that cannot be written everywhere stays active: the kernel lists its bad sectors, and has no copy for them.
+void RefuseBadBlocks(const RAIDINFO &array, const std::string &attempted)
+{
+    for (const std::string &member : Members(array, RAID_MEMBER_ACTIVE))
+        if (!KernelText(ArrayFile(array.szPath, "dev-" + DeviceName(member) + "/bad_blocks")).value_or("").empty())
+            throw Failure{.attempted = attempted,
+                          .reason = member + " has sectors that could not be written, and the array no copy for them",
+                          .hint = "pull it; then tavoctl raid replace gives the array another disk"};
+}
+
 void WaitFrom(Clock::time_point start, const std::string &path, int64_t timeout)
 {
     constexpr int most_quiet = 10;
@@ -24,7 +34,7 @@ void WaitFrom(Clock::time_point start, const std::string &path, int64_t timeout)
         const bool busy = array->fRebuilding != 0;
         quiet = busy ? 0 : quiet + 1;
         if (!busy && array->nStatus == RAID_STATUS_NORMAL)
-            return;
+            return RefuseBadBlocks(*array, attempted);
         // A spare that has just come is rebuilt onto after a moment.
         const bool begins = array->nStatus == RAID_STATUS_DEGRADED && !Members(*array, RAID_MEMBER_SPARE).empty();
         FailIf(!busy && !(begins && quiet < most_quiet), attempted, std::string("it is ") + StatusText(array->nStatus));
