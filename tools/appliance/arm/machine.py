@@ -288,8 +288,9 @@ class Machine:
         return [*words, '-blockdev', json.dumps({'node-name': f'disk{bay}', **node})]
 
     def stall(self, bay, stalled=True):
-        """Has a drive with the filter 'throttle' stop answering, or go on."""
-        self.monitor('qom-set', path=f'/objects/pace{bay}', property='limits', value={'bps-total': 1 if stalled else 0})
+        """Has a drive with the filter 'throttle' answer a request of 64 KiB after 8 s, or go on. When the kernel resets a drive
+        that does not answer at all, the whole emulator waits for it."""
+        self.monitor('qom-set', path=f'/objects/pace{bay}', property='limits', value={'bps-total': 8192 if stalled else 0})
 
     def _bay(self, bay):
         if self.hardware.bus == 'sata':

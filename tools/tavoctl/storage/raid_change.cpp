@@ -2,6 +2,7 @@
 #include "tavo_appliance.h"
 
 #include "frame/containers.h"
+#include "frame/files.h"
 #include "storage/arrays.h"
 #include "storage/device.h"
 #include "storage/raid_verbs.h"

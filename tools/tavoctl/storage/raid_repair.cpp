@@ -1,4 +1,5 @@
 // tavoctl raid: starting arrays after a power failure, and new disks for failed ones.
+#include "frame/files.h"
 #include "storage/arrays.h"
 #include "storage/device.h"
 #include "storage/raid_verbs.h"

@@ -17,10 +17,9 @@ using Clock = std::chrono::steady_clock;
 void RefuseBadBlocks(const RAIDINFO &array, const std::string &attempted)
 {
     for (const std::string &member : Members(array, RAID_MEMBER_ACTIVE))
-        if (!KernelText(ArrayFile(array.szPath, "dev-" + DeviceName(member) + "/bad_blocks")).value_or("").empty())
-            throw Failure{.attempted = attempted,
-                          .reason = member + " has sectors that could not be written, and the array no copy for them",
-                          .hint = "pull it; then tavoctl raid replace gives the array another disk"};
+        FailIf(!KernelText(ArrayFile(array.szPath, "dev-" + DeviceName(member) + "/bad_blocks")).value_or("").empty(),
+               attempted, member + " has sectors that could not be written, and the array no copy for them",
+               "pull it; then tavoctl raid replace gives the array another disk");
 }
 
 void WaitFrom(Clock::time_point start, const std::string &path, int64_t timeout)
