@@ -24,6 +24,7 @@ namespace {
 using nlohmann::json;
 using test::ReadFile;
 using test::ScratchDir;
+using test::Succeeds;
 using test::Tavoctl;
 using test::TavoctlAtTerminal;
 using test::Words;
@@ -78,13 +79,6 @@ bool PasswordIs(const std::string &user, const std::string &password)
     return fields.size() > 1 && fields[1] == ::crypt_r(password.c_str(), fields[1].c_str(), &data);
 }
 
-void ExpectDone(const Words &words, const std::string &input = {})
-{
-    const test::Ran ran = Tavoctl(words, input);
-    EXPECT_EQ(ran.status, 0) << testing::PrintToString(words) << ran;
-    EXPECT_EQ(ran.out + ran.err, "") << testing::PrintToString(words);
-}
-
 json Shown(Words words)
 {
     words.emplace_back("--json");
@@ -97,11 +91,11 @@ class TavoctlAccounts : public testing::Test {
   protected:
     void SetUp() override
     {
-        ExpectDone({"user", "add", "anna", "--description", "Anna: of Berg", "--mail", "anna@example.com", "--shell",
-                    "/bin/sh", "--privilege", "0x23", "--expires", "2037-01-31"},
-                   "secret one\nmore");
-        ExpectDone({"user", "add", "berta", "--uid", "2000", "--gid", "101", "--cannot-change-password", "yes",
-                    "--empty-password"});
+        Succeeds({"user", "add", "anna", "--description", "Anna: of Berg", "--mail", "anna@example.com", "--shell",
+                  "/bin/sh", "--privilege", "0x23", "--expires", "2037-01-31"},
+                 "secret one\nmore");
+        Succeeds({"user", "add", "berta", "--uid", "2000", "--gid", "101", "--cannot-change-password", "yes",
+                  "--empty-password"});
     }
 };
 
@@ -119,46 +113,46 @@ TEST_F(TavoctlAccounts, UsersAreAddedChangedAndRenamed)
     // Facts that are not given stay, the password with its hashes too.
     const std::string hash = Fields(shadow, "anna").at(1);
     const std::vector<std::string> samba_before = Fields(samba, "anna");
-    ExpectDone({"user", "modify", "ANNA", "--description", "", "--cannot-change-password", "yes"});
+    Succeeds({"user", "modify", "ANNA", "--description", "", "--cannot-change-password", "yes"});
     EXPECT_EQ(Line(passwd, "anna"), "anna:x:" + uid + ":100::/var/services/homes/anna:/bin/sh");
     EXPECT_EQ(Line(misc, "anna"), "anna:35:anna@example.com");
     EXPECT_EQ(Fields(shadow, "anna").at(1), hash);
     EXPECT_EQ(Fields(shadow, "anna").at(3), "100000");
-    ExpectDone({"user", "expire", "anna", "never"});
+    Succeeds({"user", "expire", "anna", "never"});
     EXPECT_EQ(Fields(shadow, "anna").at(7), "");
     EXPECT_EQ(Fields(samba, "anna").at(2), samba_before.at(2));
     EXPECT_EQ(Fields(samba, "anna").at(3), samba_before.at(3));
 
-    ExpectDone({"group", "add", "staff", "--members", "Berta,anna", "--description", "All of us"});
-    ExpectDone({"user", "rename", "anna", "Anna"});
-    ExpectDone({"user", "rename", "berta", "bert"});
+    Succeeds({"group", "add", "staff", "--members", "Berta,anna", "--description", "All of us"});
+    Succeeds({"user", "rename", "anna", "Anna"});
+    Succeeds({"user", "rename", "berta", "bert"});
     EXPECT_EQ(Line(passwd, "Anna"), "Anna:x:" + uid + ":100::/var/services/homes/Anna:/bin/sh");
     EXPECT_EQ(Line(passwd, "anna") + Line(passwd, "berta"), "");
     EXPECT_EQ(Fields(groups, "staff").at(3), "bert,Anna");
     EXPECT_TRUE(PasswordIs("Anna", "secret one"));
 
     EXPECT_EQ(Tavoctl({"user", "delete", "anna", "bert"}).status, 2);  // there is no terminal to ask at
-    ExpectDone({"user", "delete", "--yes", "anna", "bert"});
+    Succeeds({"user", "delete", "--yes", "anna", "bert"});
     EXPECT_EQ(Line(passwd, "Anna") + Line(shadow, "Anna") + Line(misc, "bert") + Line(samba, "bert"), "");
     EXPECT_EQ(Line(groups, "staff"), "staff:x:" + Fields(groups, "staff").at(2) + ":");
 }
 
 TEST_F(TavoctlAccounts, GroupsAreAddedChangedAndRenamed)
 {
-    ExpectDone({"group", "add", "staff"});
+    Succeeds({"group", "add", "staff"});
     const std::string gid = Fields(groups, "staff").at(2);
-    ExpectDone({"group", "modify", "staff", "--join", "ANNA,berta,anna"});
+    Succeeds({"group", "modify", "staff", "--join", "ANNA,berta,anna"});
     EXPECT_EQ(Line(groups, "staff"), "staff:x:" + gid + ":anna,berta");
-    ExpectDone({"group", "modify", "STAFF", "--leave", "Anna", "--description", "Us"});
+    Succeeds({"group", "modify", "STAFF", "--leave", "Anna", "--description", "Us"});
     EXPECT_EQ(Line(groups, "staff"), "staff:x:" + gid + ":berta");
-    ExpectDone({"group", "modify", "staff", "--members", "", "--gid", "70000"});
-    ExpectDone({"group", "rename", "staff", "Team"});
+    Succeeds({"group", "modify", "staff", "--members", "", "--gid", "70000"});
+    Succeeds({"group", "rename", "staff", "Team"});
     EXPECT_EQ(Line(groups, "Team") + Line(groups, "staff"), "Team:x:70000:");
     EXPECT_EQ(Line("/etc/group_desc", "Team"), "Team:Us");
     EXPECT_EQ(Shown({"group", "show", "team"}), json::parse(R"({"name": "Team", "kind": "local", "gid": 70000,
         "description": "Us", "members": [], "strangers": []})"));
     EXPECT_THAT(Shown({"group", "show", "users"}).at("members"), AllOf(Contains("anna"), Contains("admin")));
-    ExpectDone({"group", "delete", "--yes", "team"});
+    Succeeds({"group", "delete", "--yes", "team"});
     EXPECT_EQ(Line(groups, "Team"), "");
 }
 
@@ -242,10 +236,7 @@ TEST_F(TavoctlAccounts, RefusalsChangeNothing)
     };
     for (const Refusal &refusal : refusals) {
         const std::vector<std::string> before = AccountFiles();
-        const test::Ran ran = Tavoctl(refusal.words);
-        EXPECT_EQ(ran.status, refusal.status) << testing::PrintToString(refusal.words) << ran;
-        EXPECT_THAT(ran.err, HasSubstr(refusal.reason)) << testing::PrintToString(refusal.words);
-        EXPECT_EQ(ran.out, "");
+        test::IsRefused(refusal.words, refusal.reason, refusal.status);
         EXPECT_EQ(AccountFiles(), before) << testing::PrintToString(refusal.words);
     }
 }
@@ -290,26 +281,26 @@ TEST_F(TavoctlAccounts, UsersWhoAreAtWorkAreDeletedByForceOnly)
     EXPECT_EQ(Tavoctl({"user", "delete", "--dry-run", "anna", "berta"}).status, 0);
     session.ut_pid = ::getpid();
     record();
-    ExpectDone({"user", "delete", "--yes", "--force", "anna", "berta"});
+    Succeeds({"user", "delete", "--yes", "--force", "anna", "berta"});
     EXPECT_EQ(Line(passwd, "anna") + Line(passwd, "berta"), "");
 
-    ExpectDone({"group", "add", "staff", "--gid", "70000"});
-    ExpectDone({"user", "add", "carla", "--empty-password", "--gid", "70000"});
+    Succeeds({"group", "add", "staff", "--gid", "70000"});
+    Succeeds({"user", "add", "carla", "--empty-password", "--gid", "70000"});
     ran = Tavoctl({"group", "delete", "--yes", "staff"});
     EXPECT_EQ(ran.status, 2) << ran;
     EXPECT_THAT(ran.err, HasSubstr("the primary group of carla"));
-    ExpectDone({"group", "delete", "--yes", "--force", "staff"});
+    Succeeds({"group", "delete", "--yes", "--force", "staff"});
     EXPECT_EQ(Line(groups, "staff"), "");
 }
 
 TEST_F(TavoctlAccounts, LocksAndAgesOutliveOtherChanges)
 {
     const std::string hash = Fields(shadow, "anna").at(1);
-    ExpectDone({"user", "aging", "anna", "--min", "1", "--max", "90", "--warn", "14"});
-    ExpectDone({"user", "lock", "anna", "berta"});
-    ExpectDone({"user", "lock", "anna"});
-    ExpectDone({"user", "modify", "anna", "--description", "away"});
-    ExpectDone({"user", "rename", "anna", "anna2"});
+    Succeeds({"user", "aging", "anna", "--min", "1", "--max", "90", "--warn", "14"});
+    Succeeds({"user", "lock", "anna", "berta"});
+    Succeeds({"user", "lock", "anna"});
+    Succeeds({"user", "modify", "anna", "--description", "away"});
+    Succeeds({"user", "rename", "anna", "anna2"});
     EXPECT_EQ(Fields(shadow, "anna2").at(1), "!" + hash);
     EXPECT_EQ(Fields(samba, "anna2").at(4), "[DU         ]");
     const json user = Shown({"user", "show", "anna2"});
@@ -317,13 +308,13 @@ TEST_F(TavoctlAccounts, LocksAndAgesOutliveOtherChanges)
                 ElementsAre(1, 90, 14));
     EXPECT_EQ(user.at("password"), "locked");
 
-    ExpectDone({"user", "unlock", "anna2", "berta"});
+    Succeeds({"user", "unlock", "anna2", "berta"});
     EXPECT_EQ(Fields(shadow, "anna2").at(1), hash);
     EXPECT_EQ(Fields(samba, "anna2").at(4), "[U          ]");
     EXPECT_TRUE(PasswordIs("anna2", "secret one"));
     // The password of berta is fixed by her ages.
-    ExpectDone({"user", "aging", "berta", "--warn", "3"});
-    ExpectDone({"user", "modify", "berta", "--cannot-change-password", "no"});
+    Succeeds({"user", "aging", "berta", "--warn", "3"});
+    Succeeds({"user", "modify", "berta", "--cannot-change-password", "no"});
     EXPECT_EQ(Line(shadow, "berta").substr(Line(shadow, "berta").find(":0:99999:")), ":0:99999:3:::");
 }
 
@@ -351,8 +342,8 @@ TEST_F(TavoctlAccounts, TheModelsLimitHolds)
     EXPECT_EQ(Line(passwd, "carla"), "");
     for (const char *settings : {"supportguest=yes\nmaxaccounts=5\n", "supportguest=yes\n"}) {
         WriteFile("/etc.defaults/tavoinfo.conf", settings);
-        ExpectDone({"user", "add", "--empty-password", "carla"});
-        ExpectDone({"user", "delete", "--yes", "carla"});
+        Succeeds({"user", "add", "--empty-password", "carla"});
+        Succeeds({"user", "delete", "--yes", "carla"});
     }
 }
 
@@ -371,20 +362,20 @@ TEST_F(TavoctlAccounts, PasswordsAreTypedTwiceAndNeverShown)
     EXPECT_EQ(type("\n", "").status, 2);
     EXPECT_TRUE(PasswordIs("anna", "n3w w0rd"));
 
-    ExpectDone({"user", "passwd", "anna"}, "piped\n");
+    Succeeds({"user", "passwd", "anna"}, "piped\n");
     EXPECT_TRUE(PasswordIs("anna", "piped"));
     EXPECT_EQ(Tavoctl({"user", "passwd", "anna"}, "").status, 2);
     EXPECT_EQ(Tavoctl({"user", "passwd", "anna"}, std::string("a\0b\n", 4)).status, 2);
     EXPECT_EQ(Tavoctl({"user", "passwd", "anna"}, Fields(shadow, "anna").at(1)).status, 2);
     EXPECT_TRUE(PasswordIs("anna", "piped"));
-    ExpectDone({"user", "passwd", "anna", "--empty-password"});
+    Succeeds({"user", "passwd", "anna", "--empty-password"});
     EXPECT_TRUE(PasswordIs("anna", ""));
 }
 
 TEST_F(TavoctlAccounts, ExportedAccountsComeBackAsTheyWere)
 {
     const ScratchDir dir;
-    ExpectDone({"user", "modify", "anna", "--description", "A, \"B\": ' C"});
+    Succeeds({"user", "modify", "anna", "--description", "A, \"B\": ' C"});
     for (const bool as_json : {false, true}) {
         Words words = {"user", "export", "--hashes", "--output", dir / (as_json ? "u.json" : "u.csv")};
         Words group_words = {"group", "export", "--output", dir / (as_json ? "g.json" : "g.csv")};
@@ -392,9 +383,9 @@ TEST_F(TavoctlAccounts, ExportedAccountsComeBackAsTheyWere)
             words.emplace_back("--json");
             group_words.emplace_back("--json");
         }
-        ExpectDone({"group", "add", "staff", "--members", "berta,anna", "--description", "x, y"});
-        ExpectDone(words);
-        ExpectDone(group_words);
+        Succeeds({"group", "add", "staff", "--members", "berta,anna", "--description", "x, y"});
+        Succeeds(words);
+        Succeeds(group_words);
         struct stat state = {};
         EXPECT_EQ(::stat(words[4].c_str(), &state), 0);
         EXPECT_EQ(state.st_mode & 07777u, 0600u);
@@ -404,12 +395,12 @@ TEST_F(TavoctlAccounts, ExportedAccountsComeBackAsTheyWere)
         for (const char *name : {"anna", "berta"})
             for (const char *path : {passwd, shadow, misc, samba})
                 before.push_back(Line(path, name).substr(0, Line(path, name).find(":LCT-")));
-        ExpectDone({"user", "delete", "--yes", "anna", "berta"});
-        ExpectDone({"group", "delete", "--yes", "staff"});
+        Succeeds({"user", "delete", "--yes", "anna", "berta"});
+        Succeeds({"group", "delete", "--yes", "staff"});
         EXPECT_EQ(Tavoctl({"user", "import", words[4]}).status, 1) << "admin is there";
         EXPECT_EQ(Line(passwd, "anna"), "");
-        ExpectDone({"user", "import", "--update", words[4]});
-        ExpectDone({"group", "import", group_words[3]});
+        Succeeds({"user", "import", "--update", words[4]});
+        Succeeds({"group", "import", group_words[3]});
         std::vector<std::string> after;
         for (const char *name : {"anna", "berta"})
             for (const char *path : {passwd, shadow, misc, samba})
@@ -418,7 +409,7 @@ TEST_F(TavoctlAccounts, ExportedAccountsComeBackAsTheyWere)
         EXPECT_EQ(Fields(groups, "staff").at(3), "berta,anna");
         EXPECT_EQ(Line("/etc/group_desc", "staff"), "staff:x, y");
         EXPECT_EQ(Fields(shadow, "admin").at(1), "*") << "what has no password does not get one";
-        ExpectDone({"group", "delete", "--yes", "staff"});
+        Succeeds({"group", "delete", "--yes", "staff"});
     }
     // Hashes are only exported on request.
     EXPECT_THAT(Tavoctl({"user", "export"}).out, AllOf(HasSubstr("anna"), Not(HasSubstr("$1$"))));
@@ -442,7 +433,7 @@ TEST_F(TavoctlAccounts, ImportIsOneBatch)
         list += "user" + std::to_string(i) + ",pw" + std::to_string(i) + "\r\n";
     const int watch = ::inotify_init1(IN_NONBLOCK | IN_CLOEXEC);
     ASSERT_GE(::inotify_add_watch(watch, "/etc", IN_MOVED_TO), 0);
-    ExpectDone({"user", "import", "-"}, list);
+    Succeeds({"user", "import", "-"}, list);
     alignas(inotify_event) char bytes[8192];
     const ssize_t size = ::read(watch, bytes, sizeof bytes);
     int renames = 0;
@@ -468,12 +459,12 @@ TEST_F(TavoctlAccounts, ABatchSaysWhatBecameOfEachEntry)
         return text;
     };
     // Rights of an earlier carla cannot be taken away.
-    ExpectDone({"user", "add", "carla", "--empty-password"});
-    ExpectDone({"group", "add", "crew"});
+    Succeeds({"user", "add", "carla", "--empty-password"});
+    Succeeds({"group", "add", "crew"});
     WriteFile("/usr/tavo/etc/smb.conf", "[x]\n\tvalid users = carla,@crew\n");
     ASSERT_EQ(::mkdir("/usr/tavo/etc/smb.conf.tmp", 0700), 0);
-    ExpectDone({"user", "delete", "--yes", "carla"});
-    ExpectDone({"group", "delete", "--yes", "crew"});
+    Succeeds({"user", "delete", "--yes", "carla"});
+    Succeeds({"group", "delete", "--yes", "crew"});
     const std::string list = "name,password\nx,1\ncarla,1\nanna,\n";
     const Words import = {"user", "import", "--update", "--json", "-"};
     Words dry = import;
@@ -558,11 +549,8 @@ TEST_F(TavoctlAccounts, AListThatIsWrongAnywhereIsRefusedWhole)
         const char *reason;
     } inputs[] = {{"/dev/zero", "not a regular file"}, {dir / "fifo", "not a regular file"}, {dir / "large", "16 MiB"}};
     for (const auto &[path, reason] : inputs)
-        for (const char *family : {"user", "group"}) {
-            const test::Ran ran = Tavoctl({family, "import", path});
-            EXPECT_EQ(ran.status, 2) << path;
-            EXPECT_THAT(ran.err, HasSubstr(reason)) << path;
-        }
+        for (const char *family : {"user", "group"})
+            test::IsRefused({family, "import", path}, reason, 2);
     EXPECT_EQ(test::ShellStatus(std::system("tavoctl user import - </dev/zero 2>/dev/null")), 2);
     EXPECT_EQ(test::ShellStatus(std::system("tr '\\0' x </dev/zero | tavoctl user import - 2>/dev/null")), 2);
 }
@@ -588,16 +576,13 @@ TEST_F(TavoctlAccounts, ChangesAreShownBeforeAndSaidAfter)
     EXPECT_EQ(run({"user", "delete", "--dry-run", "anna"}).at("changed"), true);
     EXPECT_EQ(AccountFiles(), before);
 
-    struct stat old_state = {};
-    ::stat(passwd, &old_state);
+    const ino_t inode = test::InodeOf(passwd);
     for (const Words &words :
          std::vector<Words>{{"user", "modify", "anna", "--mail", "anna@example.com", "--privilege", "35"},
                             {"user", "expire", "anna", "2037/01/31"},
                             {"user", "rename", "anna", "anna"}})
         EXPECT_EQ(run(words), (json{{"changed", false}, {"changes", json::array()}})) << testing::PrintToString(words);
-    struct stat state = {};
-    ::stat(passwd, &state);
-    EXPECT_EQ(state.st_ino, old_state.st_ino) << "nothing was written";
+    EXPECT_EQ(test::InodeOf(passwd), inode) << "nothing was written";
     EXPECT_EQ(AccountFiles(), before);
 
     EXPECT_EQ(run({"user", "modify", "anna", "--mail", "a@example.com"}).at("changes"), json{mail});
@@ -610,7 +595,7 @@ TEST_F(TavoctlAccounts, ChangesAreShownBeforeAndSaidAfter)
 
 TEST_F(TavoctlAccounts, CheckNamesEveryDifferenceAndRepairsNone)
 {
-    ExpectDone({"group", "add", "staff", "--members", "anna"});
+    Succeeds({"group", "add", "staff", "--members", "anna"});
     EXPECT_EQ(Shown({"user", "check"}), json::array());
     EXPECT_EQ(Tavoctl({"user", "check"}).status, 0);
     EXPECT_EQ(Tavoctl({"group", "check"}).status, 0);

@@ -39,6 +39,7 @@ class NeedsPrograms : public testing::Environment {
 };
 [[maybe_unused]] const testing::Environment *const needs = testing::AddGlobalTestEnvironment(new NeedsPrograms);
 
+// Beyond what the contract over all verbs asks of each.
 TEST(TavoctlFrame, WrongCommandLinesAreUsageAndSayNothingOnStandardOutput)
 {
     const Words lines[] = {
@@ -46,13 +47,9 @@ TEST(TavoctlFrame, WrongCommandLinesAreUsageAndSayNothingOnStandardOutput)
         {"nonsense"},
         {"conf"},
         {"conf", "nonsense"},
-        {"conf", "get"},
         {"conf", "get", "a", "b"},
-        {"conf", "get", "--nonsense", "a"},
         {"conf", "get", "--file"},
         {"conf", "get", "--file", "/etc/hosts", "--defaults", "a"},
-        {"conf", "set", "key"},
-        {"conf", "set", "--timeout", "soon", "key", "value"},
         {"conf", "set", "--timeout", "-1", "key", "value"},
         {"conf", "set", "bad=key", "value"},
         {"conf", "set", "key", "two\nlines"},
@@ -64,35 +61,24 @@ TEST(TavoctlFrame, WrongCommandLinesAreUsageAndSayNothingOnStandardOutput)
         {"lock", "run", "nonsense", "--", "true"},
         {"lock", "run", "0x806", "--", "true"},
         {"lock", "run", "0", "--", "true"},
-        {"proc", "run"},
         {"proc", "run", "--timeout", "0", "true"},
-        {"proc", "signal", "/tmp/pid", "NONSENSE"},
-        {"error", "explain"},
         {"error", "list", "--output", "nonsense"},
         {"error", "list", "--output", ""},
         {"user", "show"},
         {"user", "add", "eve", "--empty-password", "--unknown-password"},
-        {"user", "add", "eve", "--empty-password", "--expires", "soon"},
         {"user", "add", "eve", "--empty-password", "--expires", "1969/12/31"},
-        {"user", "add", "eve", "--empty-password", "--privilege", "many"},
         {"user", "add", "eve", "--empty-password", "--uid", "1024"},
         {"user", "add", "eve", "--empty-password", "--mail", "two\nlines"},
         {"user", "add", "eve"},  // and no password on standard input
         {"user", "modify", "admin"},
-        {"user", "modify", "admin", "--cannot-change-password", "maybe"},
         {"user", "delete", "--yes", "nobody"},
         {"group", "modify", "users", "--join", "admin"},
         {"group", "modify", "administrators"},
         {"group", "delete", "--yes", "administrators"},
         {"group", "rename", "users", "folks"},
-        {"quota", "on"},
-        {"quota", "on", "one"},
         {"quota", "on", "0"},
-        {"quota", "set", "admin", "1"},
-        {"quota", "set", "admin", "1", "much"},
         {"quota", "set", "admin", "1", "--", "-1M"},
         {"quota", "set", "admin", "1", "nan"},
-        {"quota", "report", "one"},
     };
     for (const Words &words : lines) {
         const test::Ran ran = Tavoctl(words);
@@ -171,11 +157,8 @@ TEST(TavoctlFrame, ForeignMachineIsNotChanged)
         {"group", "add", "eves"},
         {"quota", "off", "1"},
     };
-    for (const Words &words : lines) {
-        const test::Ran ran = Tavoctl(words);
-        EXPECT_EQ(ran.status, 1) << testing::PrintToString(words);
-        EXPECT_THAT(ran.err, HasSubstr("--force-host"));
-    }
+    for (const Words &words : lines)
+        test::IsRefused(words, "--force-host", 1);
     EXPECT_EQ(ReadFile("/etc/tavoinfo.conf"), before);
     EXPECT_EQ(dir.Names(), std::vector<std::string>{"defaults"});
 
@@ -361,11 +344,8 @@ TEST(TavoctlFrame, MistypedWordsAreSuggested)
         {{"error", "explain", "ERR_KEY_NOT_FUOND"}, 3, "did you mean ERR_KEY_NOT_FOUND?"},
         {{"error", "list", "--output", "nam"}, 2, "did you mean name?"},
     };
-    for (const auto &[words, status, suggestion] : cases) {
-        const test::Ran ran = Tavoctl(words);
-        EXPECT_EQ(ran.status, status) << testing::PrintToString(words) << ran;
-        EXPECT_THAT(ran.err, HasSubstr(suggestion)) << testing::PrintToString(words);
-    }
+    for (const auto &[words, status, suggestion] : cases)
+        test::IsRefused(words, suggestion, status);
 }
 
 TEST(TavoctlFrame, ErrorCodesAreTheLibrarysOwn)

@@ -10,7 +10,6 @@
 
 namespace {
 
-using test::Ran;
 using test::Shell;
 using test::Succeeds;
 using test::Told;

@@ -15,6 +15,7 @@
 
 #include <fcntl.h>
 #include <sys/ioctl.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -45,19 +46,28 @@ Ran AsNobody(const Start &start)
 }
 
 // A verb that has nothing to say when it is done.
-inline void Succeeds(const Words &words)
+inline void Succeeds(const Words &words, const std::string &input = {})
 {
-    const Ran ran = Tavoctl(words);
+    const Ran ran = Tavoctl(words, input);
     EXPECT_EQ(ran.status, 0) << testing::PrintToString(words) << ran;
-    EXPECT_EQ(ran.out + ran.err, "");
+    EXPECT_EQ(ran.out + ran.err, "") << testing::PrintToString(words);
 }
 
 // Busy unless another status is given.
-inline void IsRefused(const Words &words, const char *reason, int status = 4)
+inline void IsRefused(const Words &words, const std::string &reason, int status = 4, const std::string &input = {})
 {
-    const Ran ran = Tavoctl(words);
+    const Ran ran = Tavoctl(words, input);
     EXPECT_EQ(ran.status, status) << testing::PrintToString(words) << ran;
     EXPECT_NE(ran.err.find(reason), std::string::npos) << testing::PrintToString(words) << ran;
+    EXPECT_EQ(ran.out, "") << testing::PrintToString(words);
+}
+
+// Another file, even one with the same text, has another number.
+inline ino_t InodeOf(const std::string &path)
+{
+    struct stat state = {};
+    EXPECT_EQ(::stat(path.c_str(), &state), 0) << path;
+    return state.st_ino;
 }
 
 struct Answer {

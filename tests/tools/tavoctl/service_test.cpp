@@ -130,9 +130,7 @@ TEST_F(TavoctlService, StatusGivesThreeWhenItIsNotRunning)
     EXPECT_EQ(test::Facts(adrift).at("bound"), false);
     EXPECT_EQ(test::Facts(adrift).at("volumes"), json{"/volume2"});
 
-    const test::Ran unknown = Tavoctl({"service", "status", "nothing"});
-    EXPECT_EQ(unknown.status, 3);
-    EXPECT_THAT(unknown.err, HasSubstr("cannot find the service nothing: there is none of that name"));
+    test::IsRefused({"service", "status", "nothing"}, "cannot find the service nothing: there is none of that name", 3);
 }
 
 TEST_F(TavoctlService, DryRunShowsFoldersAndBindsNothing)
@@ -176,9 +174,7 @@ TEST_F(TavoctlService, ADaemonThatDiesIsNoticedWhenAskedTo)
     EXPECT_EQ(Row("web").at("enabled"), true) << "the key was set before";
     test::WriteFile("/var/standin/httpd-user.mode", "garbage\n");
     EXPECT_EQ(Tavoctl({"service", "start", "web"}).status, 0);
-    const test::Ran waited = Tavoctl({"service", "start", "--wait", "1", "web"});
-    EXPECT_EQ(waited.status, 1);
-    EXPECT_THAT(waited.err, HasSubstr("it is not running after 1 s"));
+    test::IsRefused({"service", "start", "--wait", "1", "web"}, "it is not running after 1 s", 1);
     std::filesystem::remove("/var/standin/httpd-user.mode");
     EXPECT_EQ(Tavoctl({"service", "restart", "--wait", "30", "web"}).status, 0);
 }
@@ -193,9 +189,7 @@ TEST_F(TavoctlService, ReloadSignalsOrSaysWhyNot)
             << daemon;
     }
     EXPECT_EQ(Tavoctl({"service", "reload", "crond"}).status, 3) << "it does not run";
-    const test::Ran photo = Tavoctl({"service", "reload", "photo"});
-    EXPECT_EQ(photo.status, 1);
-    EXPECT_THAT(photo.err, HasSubstr("it has no daemon that could reload"));
+    test::IsRefused({"service", "reload", "photo"}, "it has no daemon that could reload", 1);
     Tavoctl({"service", "disable", "samba"});
 }
 
@@ -229,9 +223,7 @@ TEST_F(TavoctlService, VolumeBindsTheFoldersAndRestoreFindsThemAgain)
 
     // It is gone for good: another one takes its place, but no service starts without its data unasked.
     ASSERT_EQ(::umount2("/volume1", MNT_DETACH), 0);
-    const test::Ran refused = Tavoctl({"service", "enable", "web"});
-    EXPECT_EQ(refused.status, 3);
-    EXPECT_THAT(refused.err, HasSubstr("the data of web is on /volume1, which is not mounted"));
+    test::IsRefused({"service", "enable", "web"}, "the data of web is on /volume1, which is not mounted", 3);
     EXPECT_EQ(Tavoctl({"service", "enable", "--dry-run", "web"}).status, 3);
     EXPECT_EQ(LinkTarget("/var/services/web"), "/volume1/web");
     EXPECT_EQ(Tavoctl({"service", "enable", "--force", "web"}).status, 0);

@@ -71,23 +71,6 @@ const Change changes[] = {
     {{"section", "remove", "--yes", "c"}, sections, 3, sections},
 };
 
-TEST(TavoctlSettings, ChangesAreMadeOrRefusedAndSilent)
-{
-    for (const Change &change : changes) {
-        const ScratchDir dir;
-        WriteFile(dir / "f", change.before, 0640);
-        const test::Ran ran = Tavoctl(In(dir / "f", change.words));
-        EXPECT_EQ(ran.status, change.status) << testing::PrintToString(change.words) << ran;
-        EXPECT_EQ(ReadFile(dir / "f"), change.after) << testing::PrintToString(change.words);
-        EXPECT_EQ(ran.out, "");
-        EXPECT_EQ(ran.err.empty(), ran.status == 0) << ran.err;
-        EXPECT_EQ(dir.Names(), std::vector<std::string>{"f"});
-        struct stat state = {};
-        EXPECT_EQ(::stat((dir / "f").c_str(), &state), 0);
-        EXPECT_EQ(state.st_mode & 07777u, 0640u);
-    }
-}
-
 std::vector<std::string> Split(const std::string &text)
 {
     std::vector<std::string> lines;
@@ -125,26 +108,31 @@ std::string Patched(const std::string &text, const std::string &diff)
     return after;
 }
 
-TEST(TavoctlSettings, DryRunShowsWhatTheChangeWouldDoAndLeavesEverything)
+TEST(TavoctlSettings, ChangesAreShownFirstAndThenMadeOrRefused)
 {
     for (const Change &change : changes) {
         const ScratchDir dir;
-        WriteFile(dir / "f", change.before);
-        struct stat old_state = {};
-        ::stat((dir / "f").c_str(), &old_state);
-        Words words = In(dir / "f", change.words);
+        const std::string path = dir / "f";
+        WriteFile(path, change.before, 0640);
+        const ino_t inode = test::InodeOf(path);
+        Words words = In(path, change.words);
         words.insert(words.begin() + 2, "--dry-run");
-        const test::Ran ran = Tavoctl(words);
-        EXPECT_EQ(ran.status, change.status) << testing::PrintToString(words) << ran;
-        EXPECT_EQ(ReadFile(dir / "f"), change.before);
-        struct stat state = {};
-        ::stat((dir / "f").c_str(), &state);
-        EXPECT_EQ(state.st_ino, old_state.st_ino);
+        const test::Ran planned = Tavoctl(words);
+        EXPECT_EQ(planned.status, change.status) << testing::PrintToString(words) << planned;
+        EXPECT_EQ(ReadFile(path), change.before);
+        EXPECT_EQ(test::InodeOf(path), inode);
+        EXPECT_EQ(change.status == 0 ? Patched(change.before, planned.out) : planned.out,
+                  change.status == 0 ? change.after : "");
+
+        const test::Ran ran = Tavoctl(In(path, change.words));
+        EXPECT_EQ(ran.status, change.status) << testing::PrintToString(change.words) << ran;
+        EXPECT_EQ(ReadFile(path), change.after) << testing::PrintToString(change.words);
+        EXPECT_EQ(ran.out, "");
+        EXPECT_EQ(ran.err.empty(), ran.status == 0) << ran.err;
         EXPECT_EQ(dir.Names(), std::vector<std::string>{"f"});
-        if (change.status == 0)
-            EXPECT_EQ(Patched(change.before, ran.out), change.after) << ran.out;
-        else
-            EXPECT_EQ(ran.out, "");
+        struct stat state = {};
+        EXPECT_EQ(::stat(path.c_str(), &state), 0);
+        EXPECT_EQ(state.st_mode & 07777u, 0640u);
     }
     for (const auto &entry : std::filesystem::directory_iterator("/tmp"))
         EXPECT_THAT(entry.path().filename().string(), testing::Not(StartsWith("tavoctl.")));
@@ -176,13 +164,10 @@ TEST(TavoctlSettings, JsonSaysWhatWasChanged)
     const ScratchDir dir;
     const std::string path = dir / "f";
     WriteFile(path, settings);
-    struct stat before = {};
-    ::stat(path.c_str(), &before);
+    const ino_t inode = test::InodeOf(path);
     const json same = test::Facts(In(path, {"conf", "set", "--json", "empty", ""}));
     EXPECT_EQ(same, (json{{"changed", false}, {"changes", json::array()}}));
-    struct stat after = {};
-    ::stat(path.c_str(), &after);
-    EXPECT_EQ(after.st_ino, before.st_ino) << "what is so already is not written again";
+    EXPECT_EQ(test::InodeOf(path), inode) << "what is so already is not written again";
 
     const json planned = test::Facts(In(path, {"conf", "remove", "--json", "--dry-run", "mode"}));
     EXPECT_EQ(planned.at("dry_run"), true);
@@ -281,9 +266,7 @@ TEST(TavoctlSettings, SystemSettingsAreChangedUnderTheirLock)
                                                  {"conf", "remove", "--timeout", "0", "runsamba"},
                                                  {"conf", "comment", "--timeout", "0", "runsamba"},
                                                  {"conf", "set", "--timeout", "0", "--file", dir / "link", "k", "v"}}) {
-        const test::Ran ran = Tavoctl(words);
-        EXPECT_EQ(ran.status, 4) << testing::PrintToString(words) << ran;
-        EXPECT_THAT(ran.err, HasSubstr("ERR_LOCK_FAILED (0x0400); another program holds it"));
+        test::IsRefused(words, "ERR_LOCK_FAILED (0x0400); another program holds it");
     }
     EXPECT_EQ(ReadFile("/etc/tavoinfo.conf"), before);
     // Neither looking nor another file asks for it.

@@ -5,7 +5,6 @@
 #include "support/machine.h"
 #include "support/scratch_dir.h"
 
-#include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
 
 #include <filesystem>
