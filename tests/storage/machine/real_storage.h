@@ -201,8 +201,10 @@ inline void LiveOn(int count)
                   0);
         ASSERT_EQ(RAIDStop("/dev/md7"), 0);
     } else if (current_life == "lvm") {
-        Told("pvcreate -q -ff -y" + names + " && vgcreate -q foreign" + names +
-             " && lvcreate -q -W n -l50%VG -n data foreign && vgchange -q -an foreign");
+        // Another name than that of the group on smaller disks before, some of which may still be there.
+        const std::string group = "foreign" + std::to_string(count);
+        Told("pvcreate -q -ff -y" + names + " && vgcreate -q " + group + names +
+             " && lvcreate -q -W n -l50%VG -n data " + group + " && vgchange -q -an " + group);
     } else if (current_life == "guid_table") {
         for (const std::string &disk : disks)
             Told("printf 'g\\nn\\n\\n\\n\\nw\\n' | fdisk " + disk);
