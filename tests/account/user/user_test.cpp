@@ -413,6 +413,9 @@ TEST(UserLock, RefusalsAndTheWayBack)
 {
     ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
     ASSERT_EQ(AddUser({.name = "fixed", .password = "x", .cannot_change = true}), 0);
+    ASSERT_EQ(AddUser({.name = "same ages", .password = "x"}), 0);
+    std::string shadow = test::ReadFile("/etc/shadow");
+    test::WriteFile("/etc/shadow", shadow.replace(shadow.find(":0:99999:", shadow.find("same ages:")), 9, ":30:30:"));
     const std::string open_shadow = LineOf("/etc/shadow", "alice");
     const std::string open_samba = LineOf("/usr/tavo/etc/private/smbpasswd", "alice");
     const auto before = AllFiles();
@@ -431,6 +434,7 @@ TEST(UserLock, RefusalsAndTheWayBack)
         {"would fix the password", [] { return TAVOUserAgingSet("alice", 90, 90, -1); }, ERR_BAD_PARAMETERS},
         {"beyond what is kept", [] { return TAVOUserAgingSet("alice", 99999, -1, -1); }, ERR_BAD_PARAMETERS},
         {"would free it", [] { return TAVOUserAgingSet("fixed", 1, -1, -1); }, ERR_BAD_PARAMETERS},
+        {"of one with the same ages", [] { return TAVOUserAgingSet("same ages", -1, 90, -1); }, ERR_BAD_PARAMETERS},
         {"of a fixed one", [] { return TAVOUserAgingSet("fixed", -1, 90, -1); }, ERR_BAD_PARAMETERS},
     };
     for (const auto &row : rows) {
