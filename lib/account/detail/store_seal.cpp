@@ -6,6 +6,7 @@
 #include "core/detail/open_file.h"
 #include "core/detail/temp_file.h"
 
+#include <atomic>
 #include <cinttypes>
 #include <cstring>
 #include <string>
@@ -23,10 +24,21 @@ std::string ReadSmall(const Fd &fd)
     return text;
 }
 
-// Stores are not synced to disk, so those that a crash of the machine left behind are not to be trusted.
+// Stores are not synced to disk, so those that a crash of the machine left behind are not to be trusted. No process lives
+// longer than a run of the machine, so its text is read once.
 std::string RunOfTheMachine()
 {
-    return ReadSmall(OpenFd(kBootId, O_RDONLY));
+    static constinit char known[64];
+    static constinit std::atomic<size_t> length = 0;
+    static constinit std::atomic_flag is_taken;
+    if (const size_t size = length.load(std::memory_order_acquire))
+        return std::string(known, size);
+    const std::string text = ReadSmall(OpenFd(kBootId, O_RDONLY));
+    if (!text.empty() && text.size() <= sizeof known && !is_taken.test_and_set()) {
+        text.copy(known, text.size());
+        length.store(text.size(), std::memory_order_release);
+    }
+    return text;
 }
 
 // Appends a line that changes with every change of the file. Returns false for anything but a regular file.

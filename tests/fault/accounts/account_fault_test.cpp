@@ -223,7 +223,7 @@ bool Long()
     return std::getenv("TAVO_LONG_TESTS") != nullptr;
 }
 
-// One call alone, for whoever looks into its faults.
+// One call alone, to look into its faults.
 bool IsAsked(const Call &call)
 {
     const char *only = std::getenv("TAVO_CALL");
