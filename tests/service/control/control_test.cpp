@@ -296,6 +296,11 @@ TEST_F(Services, DataFoldersAreBoundInOrderAndNamedByTheirRule)
     ASSERT_EQ(TAVOServiceActionSet(1, TAVO_SERVICE_ENABLE), 0);
     ASSERT_EQ(TAVOServiceActionSet(1, TAVO_SERVICE_DISABLE), 0);
     EXPECT_EQ(LinkTarget("/var/services/photo"), "/volume2/photo");
+
+    std::filesystem::remove("/usr/tavo/etc/share.conf");
+    std::filesystem::create_directory("/usr/tavo/etc/share.conf");
+    EXPECT_EQ(TAVOServiceVolumeGetbyShare("photo", volume, sizeof volume), -1) << "it cannot be read";
+    std::filesystem::remove("/usr/tavo/etc/share.conf");
 }
 
 // A server finds its folders when it starts.

@@ -49,13 +49,18 @@ TEST_F(MachineSleep, ListsAskSleepingDisksForNothingButTheirPower)
                               "raid info md2", "raid list --all", "storage", "partition list", "partition layout sda",
                               "volume list", "lvm list", "disk smart sda", "disk temperature sda"}) {
         std::remove("/tmp/asked");
-        Told("echo 3 >/proc/sys/vm/drop_caches");
-        const std::string before = Traffic();
-        const test::CommandResult result =
-            Shell(std::string("LD_PRELOAD=" TEST_SLEEPY_DRIVES " timeout 60 tavoctl ") + words);
+        test::CommandResult result = {};
+        // A young file system and its array write on their own now and then; what a list reads, it reads every time.
+        bool is_quiet = false;
+        for (int attempt = 0; attempt < 5 && !is_quiet; ++attempt) {
+            Told("echo 3 >/proc/sys/vm/drop_caches");
+            const std::string before = Traffic();
+            result = Shell(std::string("LD_PRELOAD=" TEST_SLEEPY_DRIVES " timeout 60 tavoctl ") + words);
+            is_quiet = Traffic() == before;
+        }
         EXPECT_NE(result.status, 124) << words;
         EXPECT_THAT(Asked(), testing::AnyOf(testing::Eq(power), testing::IsEmpty())) << words << "\n" << result.output;
-        EXPECT_EQ(Traffic(), before) << words << "\n" << result.output;
+        EXPECT_TRUE(is_quiet) << words << "\n" << result.output;
     }
     // And it is not that nothing is ever written down.
     std::remove("/tmp/asked");

@@ -102,7 +102,7 @@ ErrorLog ParseErrorLog(const unsigned char (&page)[512])
         const unsigned char *entry = page + 2 + static_cast<std::size_t>(slot) * error_entry_size;
         const unsigned char *registers = entry + error_registers;
         const uint64_t sector =
-            static_cast<uint64_t>(registers[6] & 15) << 24 | registers[5] << 16 | registers[4] << 8 | registers[3];
+            (registers[6] & 15U) << 24 | uint32_t{registers[5]} << 16 | uint32_t{registers[4]} << 8 | registers[3];
         log.last.push_back({.number = log.count - i,
                             .hours = Word(registers + 28),
                             .error = ErrorText(registers[1]),
