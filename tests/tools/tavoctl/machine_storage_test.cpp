@@ -69,10 +69,10 @@ TEST_F(MachineTavoctl, ShowsTheDisks)
 TEST_F(MachineTavoctl, TestsADriveAndReadsItsErrors)
 {
     const std::string tested = "smartctl -l selftest /dev/sda | grep -c '^# *[0-9]' || true";
-    EXPECT_EQ(Told(tested), "0\n");
+    const int before = std::stoi(Told(tested));  // a drive remembers tests of earlier cases
     Succeeds({"disk", "test", "--short", "--wait", "sda"});
     Succeeds({"disk", "test", "--long", "sda"});
-    EXPECT_EQ(Told(tested), "2\n");
+    EXPECT_EQ(std::stoi(Told(tested)), before + 2);
     EXPECT_EQ(Facts({"disk", "health", "sda"}).at(0).at("self_test"), "passed");
     EXPECT_EQ(Facts({"disk", "health", "sda"}).at(0).at("errors"), 0);
     EXPECT_EQ(Facts({"disk", "errors", "sda"}), json::array());
