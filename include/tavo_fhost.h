@@ -50,8 +50,8 @@ TAVO_API int TAVOFHOSTDumpHost(void);
 /* Reads the collected list into the caller's hash *ppshHosts, which may move: a key "NAME(ADDRESS)" with the value
  * ADDRESS for each host. Do not trust what the hosts say about themselves. A line without a valid address is skipped; a
  * name is at most 255 bytes long. The list is deleted as soon as it has been opened.
- * Returns the number of pairs in the hash, 0 with ERR_OPEN_FAILED when the list does not exist or is not
- * root's file, or -1 with ERR_BAD_PARAMETERS (NULL), ERR_READ_FAILED or ERR_OUT_OF_MEMORY.
+ * Returns the number of pairs in the hash, 0 with ERR_OPEN_FAILED when the list does not exist or belongs
+ * neither to root nor to the caller, or -1 with ERR_BAD_PARAMETERS (NULL), ERR_READ_FAILED or ERR_OUT_OF_MEMORY.
  * Files: /tmp/tavods.list */
 TAVO_API int TAVOFHOSTGet2Hash(TLIBSZHASH **ppshHosts);
 

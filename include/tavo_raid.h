@@ -225,7 +225,7 @@ TAVO_API int RAIDCreate(const RAIDREQUEST *pRequest);
  * of the record are missing, but enough are present for a degraded array, it is started by their UUID. A reshape that was
  * interrupted goes on.
  * Files: /sys/block/mdN/md
- * Runs: /sbin/mdadm */
+ * Runs: /bin/echo, /sbin/mdadm */
 TAVO_API int RAIDAssemble(const char *szPath, const char *szUuid);
 TAVO_API int RAIDAssembleByInfo(const RAIDINFO *pInfo);
 

@@ -23,8 +23,9 @@ namespace {
 constexpr size_t kPieceOfEnvironment = 8 << 10;
 static_assert(sizeof(DB_ENV) <= kPieceOfEnvironment);
 
-// The thread whose calls are replaced; 0 when there is none: pthread_self() costs no system call. The hooks are global in the program, and a lock would stay
-// locked in a child of it; so of two threads at once, the second one's calls are not replaced.
+// The thread whose calls are replaced; 0 when there is none. The hooks are global in the program, and a lock would stay
+// locked in a child of it; so of two threads at once, the second one's calls are not replaced. Asked some 20 times
+// a look-up, so by pthread_self(), which is not a system call.
 constinit std::atomic<pthread_t> owner = 0;
 
 constinit void *spares[2] = {nullptr, nullptr};
@@ -35,7 +36,7 @@ constinit int close_error = 0;
 constinit DB_ENV *environment = nullptr;
 constinit bool is_awaited = false;
 
-// The library's caller learns of a failure by its code and the system log; his standard error is not ours.
+// The library's caller learns of a failure from its code and the system log. Standard error belongs to the program.
 void DropMessage(const DB_ENV *, const char *, const char *) noexcept
 {
 }
@@ -53,14 +54,16 @@ void Exchange(int from, int to) noexcept
 
 void *AllocateOrSpare(size_t size) noexcept
 {
-    if (IsOwner() && environment)  // it has been set to zero since
+    if (!IsOwner())
+        return std::malloc(size);
+    if (environment)  // it has been set to zero since
         std::exchange(environment, nullptr)->db_errcall = DropMessage;
     void *block = std::malloc(size);
-    if (!block && IsOwner() && size <= kPieceOfEnvironment)
+    if (!block && size <= kPieceOfEnvironment)
         for (void *&spare : spares)
             if (!block)
                 std::swap(block, spare);
-    if (IsOwner() && std::exchange(is_awaited, false) && size == sizeof(DB_ENV))
+    if (std::exchange(is_awaited, false) && size == sizeof(DB_ENV))
         environment = static_cast<DB_ENV *>(block);
     return block;
 }

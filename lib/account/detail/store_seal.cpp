@@ -2,11 +2,10 @@
 #include "account/detail/store_seal.h"
 
 #include "account/detail/free_name.h"
-#include "core/detail/appliance_paths.h"
+#include "core/detail/boot_id.h"
 #include "core/detail/open_file.h"
 #include "core/detail/temp_file.h"
 
-#include <atomic>
 #include <cinttypes>
 #include <cstring>
 #include <string>
@@ -21,23 +20,6 @@ std::string ReadSmall(const Fd &fd)
     std::string text(kLargestSeal, '\0');
     const ssize_t length = fd ? ::read(fd.Get(), text.data(), text.size()) : 0;
     text.resize(length > 0 ? static_cast<size_t>(length) : 0);
-    return text;
-}
-
-// Stores are not synced to disk, so those that a crash of the machine left behind are not to be trusted. No process lives
-// longer than a run of the machine, so its text is read once.
-std::string RunOfTheMachine()
-{
-    static constinit char known[64];
-    static constinit std::atomic<size_t> length = 0;
-    static constinit std::atomic_flag is_taken;
-    if (const size_t size = length.load(std::memory_order_acquire))
-        return std::string(known, size);
-    const std::string text = ReadSmall(OpenFd(kBootId, O_RDONLY));
-    if (!text.empty() && text.size() <= sizeof known && !is_taken.test_and_set()) {
-        text.copy(known, text.size());
-        length.store(text.size(), std::memory_order_release);
-    }
     return text;
 }
 
@@ -66,7 +48,8 @@ bool AddLine(std::string &text, const char *path, bool may_be_missing)
 // The seal's part about the stores; empty when they are incomplete.
 std::string StoresText(const StoreFamily &family)
 {
-    std::string text = RunOfTheMachine();
+    // Stores are not synced to disk, so those that a crash of the machine left behind are not to be trusted.
+    std::string text = BootId();
     for (const StoreRow &store : family.stores)
         if (!AddLine(text, store.path, false))
             return {};

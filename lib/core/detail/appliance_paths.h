@@ -8,7 +8,6 @@ inline constexpr char kSettings[] = "/etc/tavoinfo.conf";                  // th
 inline constexpr char kFactorySettings[] = "/etc.defaults/tavoinfo.conf";  // the model's capabilities
 inline constexpr char kShareFile[] = "/usr/tavo/etc/share.conf";           // shared folders, a section each
 inline constexpr char kSambaFile[] = "/usr/tavo/etc/smb.conf";             // Samba's settings
-inline constexpr char kBootId[] = "/proc/sys/kernel/random/boot_id";  // another text after each start of the kernel
 
 }  // namespace tavo
 

@@ -1,6 +1,7 @@
 // The state of the network before a change: recording and restoring it.
 #include "network/detail/checkpoint.h"
 
+#include "core/detail/boot_id.h"
 #include "core/detail/log.h"
 #include "core/detail/open_file.h"
 #include "core/detail/process_list.h"

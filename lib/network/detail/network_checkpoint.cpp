@@ -4,6 +4,7 @@
 #include "tavo_error.h"
 
 #include "core/detail/appliance_paths.h"
+#include "core/detail/boot_id.h"
 #include "core/detail/file_rewrite.h"
 #include "core/detail/key_value_line.h"
 #include "core/detail/log.h"

@@ -1,7 +1,6 @@
 // A process that is still the same one.
 #include "network/detail/process_identity.h"
 
-#include "core/detail/appliance_paths.h"
 #include "core/detail/process_list.h"
 #include "core/detail/text_fields.h"
 #include "network/detail/kernel_interface.h"
@@ -56,11 +55,6 @@ pid_t ToPid(std::string_view text)
     pid_t pid = 0;
     std::from_chars(text.data(), text.data() + text.size(), pid);
     return pid;
-}
-
-std::string BootId()
-{
-    return ReadKernelFile(kBootId).value_or("unknown\n");
 }
 
 }  // namespace tavo

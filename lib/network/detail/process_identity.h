@@ -21,9 +21,6 @@ void EndProcess(pid_t pid, std::string_view beginning);
 // 0 for a text that is not a number.
 pid_t ToPid(std::string_view text);
 
-// The kernel's id of this start of the system, with a newline.
-std::string BootId();
-
 }  // namespace tavo
 
 #endif

@@ -284,6 +284,7 @@ TEST_P(MachineArrays, AReshapeGoesOnWhenItsArrayIsStartedAgain)
     const std::string sum = Told("head -c 32M /dev/md2 | md5sum");
     Told("tavoctl raid speed --least 100 --most 500 md2; tavoctl raid grow --yes md2 sdd; sleep 1");
     const std::string uuid = UuidOf("/dev/md2");
+    ASSERT_NE(Told("cat /sys/block/md2/md/reshape_position"), "none\n");
     ASSERT_EQ(RAIDStop("/dev/md2"), 0);
     ASSERT_EQ(RAIDAssemble("/dev/md2", uuid.c_str()), 0);
     EXPECT_EQ(Told("timeout 60 head -c 32M /dev/md2 | md5sum"), sum);

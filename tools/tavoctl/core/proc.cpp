@@ -36,7 +36,7 @@ std::vector<std::string> SignalNames()
     return names;
 }
 
-// The number of "HUP", "SIGHUP" or "1"; empty when there is no such signal. 0 is one: it tests.
+// The number of "HUP", "SIGHUP" or "1"; nothing for other text. Signal 0 only tests that the process is there.
 std::optional<int> SignalNumber(const std::string &text)
 {
     const std::string name = text.starts_with("SIG") ? text.substr(3) : text;

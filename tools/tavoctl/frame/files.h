@@ -42,8 +42,8 @@ std::optional<std::string> KernelText(const std::string &path);
 // Writes a setting of the kernel's; throws a Failure when it does not take it.
 void SetKernelText(const std::string &path, const std::string &text, const std::string &attempted);
 
-// The names in a folder, sorted; none when there is no such folder. Throws a Failure when it cannot be read to its end:
-// a device whose users cannot be listed must not count as free.
+// The names in a folder, sorted; empty when the folder does not exist. Throws a Failure when it cannot be read to its
+// end: a device whose users cannot be listed must not count as free.
 std::vector<std::string> FolderNames(const std::string &path);
 
 }  // namespace tavoctl

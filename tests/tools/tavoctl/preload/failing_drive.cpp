@@ -1,13 +1,11 @@
 // Loaded before the C library into tavoctl: a drive that works on a self-test, finds that it cannot read, and has written
 // that down. Each step is a line in /tmp/asked, which the next one counts.
-#include <cstdarg>
+#include "drive_requests.h"
+
 #include <cstdio>
 #include <cstring>
 
 #include <linux/hdreg.h>
-#include <sys/ioctl.h>
-#include <sys/syscall.h>
-#include <unistd.h>
 
 namespace {
 
@@ -25,7 +23,7 @@ int Note(const char *line)
     return lines;
 }
 
-int Answer(unsigned char *bytes)
+void Answer(unsigned char *bytes)
 {
     unsigned char *const page = bytes + 4;
     const unsigned char feature = bytes[2];
@@ -50,22 +48,15 @@ int Answer(unsigned char *bytes)
         page[2 + 63] = 4711 % 256;
         page[2 + 64] = 4711 / 256;
     }
-    return 0;
 }
 
 }  // namespace
 
-extern "C" int ioctl(int fd, unsigned long request, ...) noexcept
+static bool Answers(unsigned long request, void *argument)
 {
-    va_list arguments;
-    va_start(arguments, request);
-    void *const argument = va_arg(arguments, void *);
-    va_end(arguments);
     auto *const bytes = static_cast<unsigned char *>(argument);
-    if (request == HDIO_DRIVE_CMD && bytes && bytes[0] == kSmart)
-        return Answer(bytes);
-    return static_cast<int>(::syscall(SYS_ioctl, fd, request, argument));
+    if (request != HDIO_DRIVE_CMD || bytes[0] != kSmart)
+        return false;
+    Answer(bytes);
+    return true;
 }
-
-// What 32-bit programs with 64-bit times call.
-extern "C" int __ioctl_time64(int, unsigned long, ...) noexcept __attribute__((alias("ioctl")));

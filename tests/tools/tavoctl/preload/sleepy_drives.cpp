@@ -1,14 +1,12 @@
 // Loaded before the C library into tavoctl and the tools that it runs: every drive says that it sleeps, and whatever else
 // would reach a drive as a command is written down in /tmp/asked, a line each, in hexadecimal.
-#include <cstdarg>
+#include "drive_requests.h"
+
 #include <cstdio>
 
 #include <fcntl.h>
 #include <linux/hdreg.h>
 #include <scsi/sg.h>
-#include <sys/ioctl.h>
-#include <sys/syscall.h>
-#include <unistd.h>
 
 namespace {
 
@@ -32,25 +30,18 @@ void Note(const char *format, ...)
 
 }  // namespace
 
-extern "C" int ioctl(int fd, unsigned long request, ...) noexcept
+static bool Answers(unsigned long request, void *argument)
 {
-    va_list arguments;
-    va_start(arguments, request);
-    void *const argument = va_arg(arguments, void *);
-    va_end(arguments);
-    if (request == HDIO_DRIVE_CMD && argument) {
-        auto *const bytes = static_cast<unsigned char *>(argument);
-        Note("%02X\n", bytes[0]);
-        if (bytes[0] == kCheckPower) {
-            bytes[2] = 0;  // standby
-            return 0;
-        }
-    } else if (request == SG_IO) {
+    if (request == SG_IO) {
         const auto *const header = static_cast<const sg_io_hdr_t *>(argument);
         Note("SG_IO %02X\n", header->cmdp ? header->cmdp[0] : 0u);
     }
-    return static_cast<int>(::syscall(SYS_ioctl, fd, request, argument));
+    if (request != HDIO_DRIVE_CMD)
+        return false;
+    auto *const bytes = static_cast<unsigned char *>(argument);
+    Note("%02X\n", bytes[0]);
+    if (bytes[0] != kCheckPower)
+        return false;
+    bytes[2] = 0;  // standby
+    return true;
 }
-
-// What 32-bit programs with 64-bit times call.
-extern "C" int __ioctl_time64(int, unsigned long, ...) noexcept __attribute__((alias("ioctl")));
