@@ -1,6 +1,7 @@
 // Takes the place of syslog in a test program.
 #include "support/captured_log.h"
 
+#include <algorithm>
 #include <cstdarg>
 #include <cstdio>
 #include <utility>
@@ -34,16 +35,24 @@ std::vector<std::string> CapturedLog::Texts() const
     return texts;
 }
 
+std::vector<std::string> CapturedLog::TakeTexts()
+{
+    std::vector<std::string> texts = Texts();
+    lines_.clear();
+    for (std::string &text : texts) {
+        const size_t begin = text.find_first_of(":(") + 1;
+        const size_t end = text.find_first_not_of("0123456789", begin);
+        if (begin > 0 && end != begin)
+            text.replace(begin, std::min(end, text.size()) - begin, "#");
+    }
+    return texts;
+}
+
 std::string CapturedLog::Take()
 {
     std::string all;
-    for (const LoggedLine &line : std::exchange(lines_, {})) {
-        all += (all.empty() ? "" : "\n") + line.text;
-        const size_t begin = all.find_first_of(":(", all.size() - line.text.size()) + 1;
-        const size_t end = all.find_first_not_of("0123456789", begin);
-        if (begin > 0 && end != begin)
-            all.replace(begin, end - begin, "#");
-    }
+    for (const std::string &text : TakeTexts())
+        all += (all.empty() ? "" : "\n") + text;
     return all;
 }
 

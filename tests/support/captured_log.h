@@ -24,8 +24,9 @@ class CapturedLog {
 
     const std::vector<LoggedLine> &Lines() const { return lines_; }
     std::vector<std::string> Texts() const;
-    // The texts since the last call, one below the other, with "#" for the number after a module's name:
-    // "raid_stop:# Bad parameters".
+    // The texts since the last call, with "#" for the number after a module's name: "raid_stop:# Bad parameters".
+    std::vector<std::string> TakeTexts();
+    // The same, one below the other.
     std::string Take();
     void Clear() { lines_.clear(); }
 

@@ -6,9 +6,11 @@
 #include "support/appliance_root.h"
 #include "support/own_child.h"
 #include "support/owned_container.h"
+#include "support/story.h"
 
 #include <chrono>
 #include <functional>
+#include <utility>
 
 #include <fcntl.h>
 #include <sys/file.h>
@@ -16,25 +18,15 @@
 #include <unistd.h>
 
 using test::Cards;
-using test::LastFault;
 using test::ReadFile;
 using test::WriteFile;
-using testing::ElementsAre;
-using testing::EndsWith;
-using testing::IsEmpty;
 
 namespace {
 
 constexpr const char *kList = "/tmp/tavods.list";
 constexpr const char *kTaken = "/tmp/tavods.list.tmp";
 
-struct Sent {
-    std::string from, to, bytes;
-
-    bool operator==(const Sent &) const = default;
-};
-
-std::vector<Sent> sent;
+std::vector<std::string> sent;
 std::string bound;
 std::string no_send_from;
 std::string no_bind_to;
@@ -54,7 +46,12 @@ class Discovery : public Cards {
         no_send_from = no_bind_to = "";
         std::filesystem::remove_all(kList);
         std::filesystem::remove_all(kTaken);
+        story_.Mask("(sockfd=|s_addr = )[0-9]+", "$1...");
     }
+
+    static std::vector<std::string> TakeSent() { return std::exchange(sent, {}); }
+
+    test::Story story_{TEST_GOLDEN, {TakeSent, test::LogOf(log_), test::CallsOf(calls_, "sleep")}, {kList, kTaken}};
 };
 
 const std::string kQuery("\x12\x34\x56\x78TAVO\x01\x04\x01\x00\x00\x00\xA4\x04\x00\x00\x02\x01", 20);
@@ -74,19 +71,14 @@ TEST(DiscoveryPackets, AreTheseBytes)
 
 TEST_F(Discovery, TheQueryLeavesTwiceFromEveryCard)
 {
-    EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u) << "no card";
-    EXPECT_THAT(sent, IsEmpty());
+    TELL(ErrFHOSTSendQueryPkt());
     AddCard("eth0", "192.0.2.10");
     AddCard("eth1", "198.51.100.10");
-    EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u);
-    const Sent first = {"192.0.2.10:0", "255.255.255.255:9999", kQuery};
-    const Sent second = {"198.51.100.10:0", "255.255.255.255:9999", kQuery};
-    EXPECT_TRUE(sent == std::vector<Sent>({first, second, first, second}));
-    sent.clear();
+    TELL(ErrFHOSTSendQueryPkt());
+    // Ten cards are more than are asked.
     for (int i = 0; i < 10; ++i)
         AddCard("eth" + std::to_string(i), "192.0.2." + std::to_string(10 + i));
-    EXPECT_EQ(ErrFHOSTSendBroadcastUdp("x", 1), 0u);
-    EXPECT_EQ(sent.size(), 8u) << "ten cards are more than are asked";
+    TELL(ErrFHOSTSendBroadcastUdp("x", 1));
 }
 
 TEST_F(Discovery, EachFailureIsABitAndTheOthersAreTried)
@@ -98,17 +90,10 @@ TEST_F(Discovery, EachFailureIsABitAndTheOthersAreTried)
     AddCard("eth2", "192.0.2.12");
     AddCard("eth3", "192.0.2.13");
     AddCard("eth4", "unreadable");
-    AddCard("eth10", "192.0.2.20");
+    AddCard("eth10", "192.0.2.20");  // the last one
     no_bind_to = "192.0.2.12:0";
     no_send_from = "192.0.2.13:0";
-    EXPECT_EQ(ErrFHOSTSendBroadcastUdp("hello", 5), 0x1Eu);
-    ASSERT_EQ(sent.size(), 2u);
-    EXPECT_EQ(sent[1].from, "192.0.2.20:0") << "the last one";
-    EXPECT_EQ(sent[1].bytes, "hello");
-    EXPECT_THAT(log_.Texts(),
-                ElementsAre(testing::MatchesRegex("bind\\(sockfd=[0-9]+, brdcast.sin_addr.s_addr = [0-9]+\\) "
-                                                  "error!! errno=99, err_str=\\[.*\\]"),
-                            "sendto error."));
+    TELL(ErrFHOSTSendBroadcastUdp("hello", 5));
 }
 
 // A port without a cable is not a failure, and the ports after it keep their bits.
@@ -119,13 +104,11 @@ TEST_F(Discovery, SkipsCardsWithoutAnAddress)
     AddCard("eth1");
     WriteFile(test::kScripts + "ifcfg-eth1", "DEVICE=eth1\nBOOTPROTO=static\n");
     AddCard("eth2");
-    EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u) << "none is configured";
-    EXPECT_THAT(sent, IsEmpty());
+    TELL(ErrFHOSTSendQueryPkt());  // none is configured
     AddCard("eth3", "192.0.2.13");
-    EXPECT_EQ(ErrFHOSTSendBroadcastUdp("x", 1), 0u);
-    EXPECT_EQ(sent.size(), 1u);
+    TELL(ErrFHOSTSendBroadcastUdp("x", 1));
     no_send_from = "192.0.2.13:0";
-    EXPECT_EQ(ErrFHOSTSendBroadcastUdp("x", 1), 0x8u);
+    TELL(ErrFHOSTSendBroadcastUdp("x", 1));
 }
 
 // This process, as the daemon does it: with the lock of the pid file.
@@ -153,10 +136,7 @@ TEST_F(Discovery, WithoutADaemonNothingIsCollected)
 {
     std::filesystem::remove("/usr/tavo/bin/findhostd");
     WriteFile("/usr/tavo/bin/findhostd", "#!/bin/sh\nexit 1\n", 0755);
-    EXPECT_EQ(TAVOFHOSTDumpHost(), -1);
-    EXPECT_THAT(Sleeps(), ElementsAre("sleep 3"));
-    EXPECT_THAT(log_.Take(), testing::StartsWith("fhost_dump_host(#): findhostd daemon is not running ...."));
-    EXPECT_THAT(sent, IsEmpty());
+    TELL(TAVOFHOSTDumpHost());
 }
 
 // Neither a name nor a pid file nor another user's lock on that file counts as a daemon.
@@ -183,7 +163,7 @@ TEST_F(Discovery, OnlyTheLockOfThePidFileIsADaemon)
     char byte;
     EXPECT_EQ(::read(ready[0], &byte, 1), 1);
     EXPECT_EQ(TAVOFHOSTDumpHost(), 0) << "it is started, and its pid is there";
-    EXPECT_THAT(log_.Texts().at(0), EndsWith("findhostd daemon is not running ...."));
+    EXPECT_THAT(log_.Texts().at(0), testing::EndsWith("findhostd daemon is not running ...."));
 }
 
 struct Heard {
@@ -203,33 +183,24 @@ TEST_F(Discovery, HostsAreHandedToACallbackAndTheListStays)
 {
     const Daemon daemon;
     AddCard("eth0", "192.0.2.10");
-    const std::string list = "6,240,nas,192.0.2.11,eth0\n7,250,attic,192.0.2.12,eth1\n0,240,none,192.0.2.13,eth0\n";
-    WriteFile(kList, list);
+    WriteFile(kList, "6,240,nas,192.0.2.11,eth0\n7,250,attic,192.0.2.12,eth1\n0,240,none,192.0.2.13,eth0\n");
     WriteFile(kTaken, "6,240,nas,192.0.2.11,eth0\n8,240,taken,192.0.2.14,eth0\n");
-    Heard heard;
-    EXPECT_EQ(TAVOFHOSTEnum(Heard::Note, &heard, 3), 3);
-    EXPECT_THAT(heard.hosts,
-                ElementsAre("6 240 nas 192.0.2.11 eth0", "7 250 attic 192.0.2.12 eth1", "8 240 taken 192.0.2.14 eth0"));
-    EXPECT_THAT(Sleeps(), ElementsAre("sleep 1", "sleep 1", "sleep 1"));
-    EXPECT_EQ(sent.size(), 2u);
-    EXPECT_EQ(ReadFile(kList), list);
-
-    // A list of an earlier search does not count as an answer.
+    const auto enumerate = [&](size_t most, int seconds) {
+        Heard heard = {{}, most};
+        TELL(TAVOFHOSTEnum(Heard::Note, &heard, seconds));
+        story_.Show("heard", heard.hosts);
+    };
+    enumerate(100, 3);
+    // A list of an earlier search does not count as an answer. The callback has heard enough.
     const auto past = std::filesystem::file_time_type::clock::now() - std::chrono::minutes(1);
     std::filesystem::last_write_time(kTaken, past);
-    heard = {{}, 1};
-    EXPECT_EQ(TAVOFHOSTEnum(Heard::Note, &heard, 3), 1) << "the callback has heard enough";
-    EXPECT_EQ(heard.hosts.size(), 1u);
-
+    enumerate(1, 3);
     no_send_from = "192.0.2.10:0";
-    heard = {};
-    EXPECT_EQ(TAVOFHOSTEnum(Heard::Note, &heard, 3), 2) << "others have answered";
+    enumerate(100, 3);  // others have answered
     std::filesystem::remove(kList);
-    EXPECT_EQ(TAVOFHOSTEnum(Heard::Note, &heard, 3), -1);
-    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "fhost_enum"}));
-    EXPECT_EQ(TAVOFHOSTEnum(nullptr, nullptr, 3), -1);
-    EXPECT_EQ(TAVOFHOSTEnum(Heard::Note, &heard, 0), -1);
-    EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+    enumerate(100, 3);
+    enumerate(100, 0);
+    TELL(TAVOFHOSTEnum(nullptr, nullptr, 3));
 }
 
 TEST_F(Discovery, MovesTheListToItsCaller)
@@ -237,16 +208,9 @@ TEST_F(Discovery, MovesTheListToItsCaller)
     const Daemon daemon;
     AddCard("eth0", "192.0.2.10");
     WriteFile(kList, "1,240,nas,192.0.2.11,x\n");
-    EXPECT_EQ(TAVOFHOSTDumpHost(), 0);
-    EXPECT_THAT(Sleeps(), ElementsAre("sleep 10"));
-    EXPECT_EQ(sent.size(), 2u);
-    EXPECT_EQ(ReadFile(kTaken), "1,240,nas,192.0.2.11,x\n");
-    EXPECT_FALSE(std::filesystem::exists(kList));
-
+    TELL(TAVOFHOSTDumpHost());
     no_send_from = "192.0.2.10:0";
-    EXPECT_EQ(TAVOFHOSTDumpHost(), -1);
-    EXPECT_THAT(log_.Take(), EndsWith("fhost_dump_host(#): ErrFHOSTSendQueryPkt() failed!"));
-    EXPECT_EQ(ReadFile(kList), "") << "made for the daemon";
+    TELL(TAVOFHOSTDumpHost());
 }
 
 TEST_F(Discovery, RemovesForeignFilesAtTheListPath)
@@ -287,20 +251,12 @@ TEST_F(Discovery, TheListIsReadLineByLine)
                       "1,240,host,10.0.0.5,again\n"
                       "1,240,liar,10.0.0.5;x,x\n"
                       "1,240,\x1B[2J,10.0.0.10,x");
-    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts), 3);
+    TELL(TAVOFHOSTGet2Hash(hosts));
     // Showing the names safely is the reader's affair.
     EXPECT_EQ(test::Pairs(hosts), (test::PairMap{{"host(10.0.0.5)", "10.0.0.5"},
                                                  {"other(10.0.0.9)", "10.0.0.9"},
                                                  {"\x1B[2J(10.0.0.10)", "10.0.0.10"}}));
-    EXPECT_EQ(log_.Take(), "fhost_get2_hash:# model number == 0\nfhost_get2_hash:# model number == 0\n"
-                           "fhost_get2_hash:# field number < 5\nfhost_get2_hash:# field number < 5\n"
-                           "fhost_get2_hash:# not an address");
-    EXPECT_FALSE(std::filesystem::exists(kTaken));
-
-    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts), 0);
-    EXPECT_EQ(LastFault(), (test::Fault{ERR_OPEN_FAILED, "fhost_get2_hash"}));
-    EXPECT_EQ(TAVOFHOSTGet2Hash(nullptr), -1);
-    EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+    TELL(TAVOFHOSTGet2Hash(hosts));
 }
 
 TEST_F(Discovery, AHashThatMustGrowStaysTheCallers)
@@ -351,7 +307,8 @@ ssize_t sendto(int, const void *bytes, size_t size, int, const sockaddr *to, soc
 {
     if (bound == no_send_from)
         return static_cast<ssize_t>(size) - 1;
-    sent.push_back({bound, Text(to), std::string(static_cast<const char *>(bytes), size)});
+    sent.push_back("send from " + bound + " to " + Text(to) + ": " +
+                   std::string(static_cast<const char *>(bytes), size));
     return static_cast<ssize_t>(size);
 }
 }

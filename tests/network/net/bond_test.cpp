@@ -5,9 +5,11 @@
 #include "network/card_record.h"
 #include "support/container_text.h"
 #include "support/own_child.h"
+#include "support/story.h"
+#include "support/text_lines.h"
 
 #include <csignal>
-#include <cstdio>
+#include <iterator>
 
 #include <dlfcn.h>
 #include <fcntl.h>
@@ -15,11 +17,8 @@
 
 using test::Cards;
 using test::kScripts;
-using test::LastFault;
 using test::ReadFile;
 using test::WriteFile;
-using testing::ElementsAre;
-using testing::IsEmpty;
 
 namespace {
 
@@ -75,103 +74,59 @@ class Bond : public Cards {
         return TAVONetLinkAggrSet(&record);
     }
 
-    static std::map<std::string, std::string> Files()
+    // Of the start script.
+    static std::vector<std::string> NetworkCalls()
     {
-        std::map<std::string, std::string> files;
-        for (const auto &entry : std::filesystem::directory_iterator(kScripts)) {
-            if (entry.is_regular_file())
-                files[entry.path().filename()] = ReadFile(entry.path());
-        }
-        return files;
+        const std::string calls = std::filesystem::exists(kCalls) ? ReadFile(kCalls) : "";
+        std::filesystem::remove(kCalls);
+        return test::Lines(calls);
     }
 
-    static std::string NetworkCalls() { return std::filesystem::exists(kCalls) ? ReadFile(kCalls) : ""; }
-
     static constexpr const char *kCalls = "/var/standin/rc.log";
-    static constexpr const char *kStopStart = "rc.network stop\nrc.network start\n";
-    const std::map<std::string, std::string> kPlainFiles = {{"ifcfg-eth0", kEth0}, {"ifcfg-eth1", kEth1}};
-    const std::map<std::string, std::string> kBondFiles = {{"ifcfg-eth0", kMember0},
-                                                           {"ifcfg-eth0.saved", kEth0},
-                                                           {"ifcfg-eth1", kMember1},
-                                                           {"ifcfg-eth1.saved", kEth1},
-                                                           {"ifcfg-bond0", kBond}};
+    test::Story story_{TEST_GOLDEN, {NetworkCalls, test::LogOf(log_)}, {kScripts}};
 };
 
 TEST_F(Bond, IsMadeChangedAndDissolved)
 {
     WriteFile(kScripts + "ifcfg-eth0.saved", "DEVICE=eth0\nIPADDR=10.");  // the remainder of an old copy
-    ASSERT_EQ(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}), 0);
-    EXPECT_EQ(Files(), kBondFiles);
-    EXPECT_EQ(NetworkCalls(), kStopStart);
-
+    TELL(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}));
     // As the kernel and the files have it: nothing to do, and no error either.
     KernelHas("balance-alb 6\n", "eth0 eth1\n");
-    test::ForgetFault();
-    EXPECT_EQ(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}), 0);
-    EXPECT_EQ(NetworkCalls(), kStopStart);
-    EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
-
+    TELL(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}));
     // Another mode keeps the address that the bond got meanwhile.
     std::string bond = kBond;
     bond.replace(bond.find(".10"), 3, ".99");
     WriteFile(kScripts + "ifcfg-bond0", bond);
-    ASSERT_EQ(Set(TAVO_NET_AGGR_LACP, {"eth0", "eth1"}), 0);
-    bond.replace(bond.find("mode"), bond.find("\"\n") - bond.find("mode"),
-                 "mode=4 use_carrier=0 miimon=100 updelay=100 lacp_rate=fast");
-    auto files = kBondFiles;
-    files["ifcfg-bond0"] = bond;
-    EXPECT_EQ(Files(), files);
-
-    std::filesystem::remove(kCalls);
-    ASSERT_EQ(Set(TAVO_NET_AGGR_NONE), 0);
-    EXPECT_EQ(Files(), kPlainFiles);
-    EXPECT_EQ(NetworkCalls(), kStopStart);
-    EXPECT_THAT(log_.Texts(), IsEmpty());
+    TELL(Set(TAVO_NET_AGGR_LACP, {"eth0", "eth1"}));
+    TELL(Set(TAVO_NET_AGGR_NONE));
 }
 
 TEST_F(Bond, AMemberThatLeavesGetsItsFileBack)
 {
-    ASSERT_EQ(Set(TAVO_NET_AGGR_BACKUP, {"eth0", "eth1"}), 0);
-    ASSERT_EQ(Set(TAVO_NET_AGGR_BACKUP, {"eth0"}), 0);
-    EXPECT_EQ(ReadFile(kScripts + "ifcfg-eth1"), kEth1);
-    EXPECT_EQ(ReadFile(kScripts + "ifcfg-eth0"), kMember0);
-
+    TELL(Set(TAVO_NET_AGGR_BACKUP, {"eth0", "eth1"}));
+    TELL(Set(TAVO_NET_AGGR_BACKUP, {"eth0"}));
     // Without its saved copy, too, it is a plain interface again.
     std::filesystem::remove(kScripts + "ifcfg-eth0.saved");
-    ASSERT_EQ(Set(TAVO_NET_AGGR_NONE), 0);
-    EXPECT_EQ(ReadFile(kScripts + "ifcfg-eth0"), "DEVICE=eth0\nONBOOT=yes\nBOOTPROTO=dhcp\n");
-    EXPECT_FALSE(std::filesystem::exists(kScripts + "ifcfg-bond0"));
+    TELL(Set(TAVO_NET_AGGR_NONE));
 }
 
 // A file cannot be written, the network does not start, or the start script dies while it stops the network.
 TEST_F(Bond, IsTakenBackWhenItCannotBeMade)
 {
-    const auto cannot = [&](int code, const std::string &calls) {
-        std::filesystem::remove(kCalls);
-        log_.Clear();
-        EXPECT_EQ(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}), -1);
-        EXPECT_EQ(LastFault(), (test::Fault{code, "net_link_aggr_set"}));
-        EXPECT_EQ(NetworkCalls(), calls);
-        EXPECT_EQ(ReadFile(kScripts + "ifcfg-eth0"), kEth0);
-        EXPECT_EQ(ReadFile(kScripts + "ifcfg-eth1"), kEth1);
-        EXPECT_FALSE(std::filesystem::exists(kScripts + "ifcfg-bond0"));
-    };
     for (int failing = 0; failing < 3; ++failing) {
         Plain();
         renames_to_fail = failing;
-        cannot(ERR_WRITE_FAILED, kStopStart);
+        story_.Head("rename " + std::to_string(failing));
+        TELL(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}));
         EXPECT_EQ(renames_to_fail, -1) << failing;
-        EXPECT_EQ(log_.Lines().size(), 1u);
     }
     Plain();
     WriteFile("/var/standin/rc.network.status", "1");
-    cannot(ERR_OP_FAILURE, std::string(kStopStart) + kStopStart);  // the old one is started
-    EXPECT_EQ(Files(), kPlainFiles);
+    TELL(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}));
     WriteFile("/var/standin/rc.network.status", "0");
     WriteFile("/var/standin/rc.network.hook",
               "#!/bin/sh\n[ $1 = start ] || [ -e /tmp/once ] || { touch /tmp/once; kill -9 $PPID; }\n", 0755);
-    cannot(ERR_OP_FAILURE, std::string("rc.network stop\n") + kStopStart);
-    EXPECT_EQ(Files(), kPlainFiles);
+    TELL(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}));
 }
 
 // Each interface is on its own, or belongs to a bond that has a file; no file is incomplete.
@@ -217,60 +172,47 @@ TEST_F(Bond, ADeathBetweenAnyTwoStepsLeavesANetworkThatStarts)
 
 TEST_F(Bond, RecordsThatMakeNoSenseAreRefused)
 {
-    const TAVONETLINKAGGR rows[] = {
+    TAVONETLINKAGGR rows[] = {
         test::Bond(4, {"eth0"}),         test::Bond(-1, {"eth0"}),         test::Bond(TAVO_NET_AGGR_LACP, {}),
         test::Bond(1, {"eth0", "eth0"}), test::Bond(1, {"eth0", "bond0"}), test::Bond(1, {"eth0", ""}),
-        test::Bond(1, {"../../shadow"}),
+        test::Bond(1, {"../../shadow"}), test::Bond(1, {"eth1"}),
     };
-    for (const TAVONETLINKAGGR &row : rows) {
-        EXPECT_EQ(TAVONetLinkAggrSet(&row), -1);
-        EXPECT_EQ(LastFault(), (test::Fault{ERR_BAD_PARAMETERS, "net_link_aggr_set"}));
-    }
-    TAVONETLINKAGGR card = test::Bond(TAVO_NET_AGGR_BACKUP, {"eth1"});
-    std::strcpy(card.szBond, "eth0");
-    EXPECT_EQ(TAVONetLinkAggrSet(&card), -1);
-    EXPECT_EQ(TLIBErrGet(), ERR_LINK_AGGR_TYPE) << "the card's file would be lost";
-    EXPECT_EQ(Files(), kPlainFiles);
-    EXPECT_EQ(NetworkCalls(), "");
+    std::strcpy(std::end(rows)[-1].szBond, "eth0");  // the card's file would be lost
+    for (const TAVONETLINKAGGR &row : rows)
+        TELL(TAVONetLinkAggrSet(&row));
 }
 
 TEST_F(Bond, IsReadFromTheKernel)
 {
     TAVONETLINKAGGR record;
-    ASSERT_EQ(TAVONetLinkAggrGet("bond0", &record), 0);
-    EXPECT_EQ(record.nMode, TAVO_NET_AGGR_NONE);
-
+    const auto get = [&] {
+        TELL(TAVONetLinkAggrGet("bond0", &record));
+        story_.Show("mode", record.nMode);
+        story_.Show("members", record.nMember);
+    };
+    get();
     KernelHas("802.3ad 4\n", "eth0 eth1\n");
-    ASSERT_EQ(TAVONetLinkAggrGet("bond0", &record), 0);
-    EXPECT_EQ(record.nMode, TAVO_NET_AGGR_LACP);
-    ASSERT_EQ(record.nMember, 2);
-    EXPECT_STREQ(record.rgszMember[1], "eth1");
-
+    get();
+    story_.Show("second", record.rgszMember[1]);
     test::List list = test::MakeList({});
-    EXPECT_EQ(test::Moving(list, TAVONetLinkAggrEnum), 1);
-    EXPECT_EQ(test::Moving(list, [](auto **addr) { return TAVONetLinkAggrPhyGet("bond0", addr); }), 2);
-    EXPECT_THAT(test::Items(list.get()), ElementsAre("bond0", "eth0", "eth1"));
-
+    TELL(test::Moving(list, TAVONetLinkAggrEnum));
+    TELL(test::Moving(list, [](auto **addr) { return TAVONetLinkAggrPhyGet("bond0", addr); }));
+    story_.Show("list", test::Items(list.get()));
     KernelHas("balance-rr 0\n", "");
-    EXPECT_EQ(TAVONetLinkAggrGet("bond0", &record), -1);
-    EXPECT_EQ(TLIBErrGet(), ERR_LINK_AGGR_OPTION);
-    EXPECT_EQ(log_.Take(), "net_link_aggr_get:# Non-supported bonding mode [balance-rr 0]");
+    get();
 }
 
 TEST_F(Bond, MembersAreAddedOnceAndOnlyCards)
 {
     TAVONETLINKAGGR record = test::Bond(TAVO_NET_AGGR_LACP, {"eth0"});
-    EXPECT_EQ(TAVONetLinkAggrOptSlsaveAdd(&record, "eth1"), 0);
-    EXPECT_EQ(TAVONetLinkAggrOptSlsaveAdd(&record, "eth1"), 0);
-    EXPECT_EQ(record.nMember, 2);
     KernelHas("802.3ad 4\n", "");
-    EXPECT_EQ(TAVONetLinkAggrOptSlsaveAdd(&record, "bond0"), -1);
-    EXPECT_EQ(TLIBErrGet(), ERR_LINK_AGGR_TYPE);
-    EXPECT_EQ(TAVONetLinkAggrOptSlsaveAdd(&record, "eth7"), -1);
-    EXPECT_EQ(TLIBErrGet(), ERR_LINK_AGGR_TYPE);
+    for (const char *name : {"eth1", "eth1", "bond0", "eth7"}) {
+        story_.Head(name);
+        TELL(TAVONetLinkAggrOptSlsaveAdd(&record, name));
+        story_.Show("members", record.nMember);
+    }
     record.nMember = 1000000;
-    EXPECT_EQ(TAVONetLinkAggrOptSlsaveAdd(&record, "eth1"), -1);
-    EXPECT_EQ(TLIBErrGet(), ERR_BAD_PARAMETERS);
+    TELL(TAVONetLinkAggrOptSlsaveAdd(&record, "eth1"));
 }
 
 }  // namespace

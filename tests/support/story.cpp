@@ -1,0 +1,160 @@
+// A test as a story.
+#include "support/story.h"
+
+#include "support/scratch_dir.h"
+#include "support/text_lines.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+#include <iterator>
+
+#include <syslog.h>
+
+namespace test {
+namespace {
+
+namespace fs = std::filesystem;
+
+std::vector<std::string> WithBegin(const char *begin, std::vector<std::string> lines)
+{
+    for (std::string &line : lines)
+        line.insert(0, begin);
+    return lines;
+}
+
+// Its name, or its number when it has none.
+std::string TextOf(int code)
+{
+    const auto index = static_cast<size_t>(code) / 0x100;
+    if (index < std::size(rgszErrMsg) && *rgszErrMsg[index])
+        return rgszErrMsg[index];
+    char number[16];
+    std::snprintf(number, sizeof number, "0x%04X", static_cast<unsigned>(code));
+    return number;
+}
+
+}  // namespace
+
+Story::~Story()
+{
+    if (text_.empty() || testing::Test::IsSkipped())
+        return;
+    const testing::TestInfo &test = *testing::UnitTest::GetInstance()->current_test_info();
+    const std::string name = std::string("/") + test.test_suite_name() + "." + test.name() + ".txt";
+    if (const char *kept = std::getenv("TAVO_KEEP_GOLDEN"))
+        WriteFile(kept + name, text_);
+    else
+        EXPECT_EQ(text_, ReadFile(golden_ + name)) << "the golden file" << name;
+}
+
+std::string Story::Text(const std::vector<std::string> &texts)
+{
+    std::string all;
+    for (const std::string &text : texts)
+        all += (all.empty() ? "" : ", ") + Text(text);
+    return all.empty() ? "none" : all;
+}
+
+// One line of the text: what cannot be printed or would be lost at its end is written as a number.
+void Story::Line(const std::string &text)
+{
+    std::string line = text;
+    for (const auto &[pattern, mask] : masks_)
+        line = std::regex_replace(line, pattern, mask);
+    for (size_t i = 0; i < line.size(); ++i) {
+        const auto byte = static_cast<unsigned char>(line[i]);
+        const bool is_plain = byte >= ' ' && byte < 0x7F && (byte != ' ' || i + 1 < line.size());
+        char number[5];
+        std::snprintf(number, sizeof number, "\\x%02X", unsigned{byte});
+        text_ += is_plain ? std::string(1, line[i]) : byte == '\t' ? "\\t" : byte == '\n' ? "\\n" : number;
+    }
+    text_ += '\n';
+}
+
+std::map<std::string, std::string> Story::Files() const
+{
+    std::map<std::string, std::string> files;
+    const auto add = [&](const fs::path &path) {
+        if (fs::is_symlink(path))
+            files[path] = "-> " + fs::read_symlink(path).string() + "\n";
+        else if (fs::is_regular_file(path))
+            files[path] = ReadFile(path);
+        else if (fs::exists(fs::symlink_status(path)))
+            files[path] = "(not a file)\n";
+    };
+    for (const std::string &path : paths_) {
+        if (!fs::is_directory(fs::symlink_status(path)))
+            add(path);
+        else
+            for (const auto &entry : fs::directory_iterator(path))
+                add(entry.path());
+    }
+    return files;
+}
+
+void Story::Begin()
+{
+    files_ = Files();
+    for (const Source &source : sources_)
+        source();
+    ForgetFault();
+}
+
+void Story::End(const std::string &text)
+{
+    const Fault fault = LastFault();
+    // The same however the source breaks its lines.
+    Line(std::regex_replace(text, std::regex("\\( "), "(") +
+         (fault.code ? ", " + TextOf(fault.code) + " of " + fault.module : ""));
+    for (const Source &source : sources_) {
+        for (const std::string &line : source())
+            Line("    " + line);
+    }
+    const std::map<std::string, std::string> files = Files();
+    for (const auto &[path, content] : files) {
+        if (const auto before = files_.find(path); before != files_.end() && before->second == content)
+            continue;
+        Line("    file " + path + (content.empty() || content.back() == '\n' ? "" : ", without a last newline"));
+        for (const std::string &line : Lines(content))
+            Line("        " + line);
+    }
+    for (const auto &[path, content] : files_) {
+        if (!files.contains(path))
+            Line("    gone " + path);
+    }
+}
+
+Story::Source CommandsOf(RecordedCommands &commands)
+{
+    return [&commands] {
+        return WithBegin("run ", commands.Take());
+    };
+}
+
+Story::Source LogOf(CapturedLog &log)
+{
+    return [&log] {
+        std::vector<std::string> lines;
+        for (const LoggedLine &line : log.Lines())
+            lines.push_back(line.priority == LOG_ERR ? "log " : "log at " + std::to_string(line.priority) + " ");
+        const std::vector<std::string> texts = log.TakeTexts();
+        for (size_t i = 0; i < texts.size(); ++i)
+            lines[i] += texts[i];
+        return lines;
+    };
+}
+
+Story::Source CallsOf(RecordedCalls &calls, const std::string &begin)
+{
+    return [&calls, begin] {
+        std::vector<std::string> lines = calls.Take();
+        std::erase_if(lines, [&](const std::string &line) { return !line.starts_with(begin); });
+        return WithBegin("call ", lines);
+    };
+}
+
+}  // namespace test
