@@ -5,12 +5,7 @@
 #include "tavo_hash.h"
 #include "tavo_list.h"
 
-#include <gtest/gtest.h>
-
-#include <map>
-#include <memory>
-#include <string>
-#include <vector>
+#include "support/test.h"
 
 namespace test {
 

@@ -6,12 +6,9 @@
 #include "tavo_group.h"
 #include "tavo_user.h"
 
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 #include <ctime>
-#include <string>
-
-#include <fcntl.h>
 
 namespace test {
 

@@ -3,10 +3,7 @@
 #ifndef TESTS_SUPPORT_MACHINE_H
 #define TESTS_SUPPORT_MACHINE_H
 
-#include <gtest/gtest.h>
-
-#include <functional>
-#include <string>
+#include "support/test.h"
 
 namespace test {
 

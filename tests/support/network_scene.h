@@ -4,14 +4,8 @@
 #define TESTS_SUPPORT_NETWORK_SCENE_H
 
 #include "support/scenario.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 #include "support/virtual_cable.h"
-
-#include <gtest/gtest.h>
-
-#include <optional>
-#include <string>
-#include <string_view>
 
 namespace test {
 

@@ -6,13 +6,7 @@
 #include "tavo_list.h"
 
 #include "support/container_text.h"
-
-#include <gtest/gtest.h>
-
-#include <map>
-#include <memory>
-#include <string>
-#include <vector>
+#include "support/test.h"
 
 namespace test {
 

@@ -1,15 +1,7 @@
 // Files that an unprivileged user may plant at a name under /tmp before the appliance uses it.
 #include "support/planted_name.h"
 
-#include "support/scratch_dir.h"
-
-#include <gtest/gtest.h>
-
-#include <filesystem>
-
-#include <fcntl.h>
-#include <sys/stat.h>
-#include <unistd.h>
+#include "support/test.h"
 
 namespace test {
 namespace {

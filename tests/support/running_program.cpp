@@ -1,15 +1,9 @@
 // Runs a program and reads both its outputs as they arrive.
 #include "support/running_program.h"
 
-#include <gtest/gtest.h>
+#include "support/test.h"
 
-#include <csignal>
-#include <utility>
-
-#include <fcntl.h>
 #include <poll.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 namespace test {
 

@@ -1,10 +1,9 @@
 // Scripts the tools that the library runs.
 #include "support/scenario.h"
 
+#include "support/test.h"
 #include "support/tools/quoted_line.h"
 #include "support/tools/scenario_dir.h"
-
-#include <gtest/gtest.h>
 
 namespace test {
 

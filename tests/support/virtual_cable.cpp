@@ -1,23 +1,11 @@
 // Appliances on one virtual cable.
 #include "support/virtual_cable.h"
 
-#include "support/appliance_root.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 
-#include <gtest/gtest.h>
-
-#include <cerrno>
-#include <csignal>
-#include <cstdio>
-#include <filesystem>
-
-#include <fcntl.h>
 #include <sched.h>
 #include <sys/mount.h>
 #include <sys/prctl.h>
-#include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 namespace test {
 namespace {

@@ -6,19 +6,11 @@
 #include "tavo_user.h"
 
 #include "core/detail/extras.h"
-#include "support/captured_log.h"
 #include "support/failing_malloc.h"
 #include "support/own_child.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
-#include <cstring>
-#include <filesystem>
+#include "support/test.h"
 
 #include <dlfcn.h>
-#include <fcntl.h>
 #include <sys/resource.h>
 
 namespace {

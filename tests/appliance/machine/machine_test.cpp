@@ -1,7 +1,7 @@
 // The virtual appliance is the machine that the families' own tests rely on: its processor and its disks.
 #include "support/machine.h"
 
-#include <gmock/gmock.h>
+#include "support/test.h"
 
 #include <sys/utsname.h>
 

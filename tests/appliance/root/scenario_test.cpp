@@ -1,12 +1,7 @@
 // The scripted tools as test programs use them: scripted_tools.sh has the cases.
 #include "support/scenario.h"
 
-#include <gmock/gmock.h>
-
-#include <csignal>
-#include <cstdlib>
-
-#include <sys/wait.h>
+#include "support/test.h"
 
 namespace {
 

@@ -1,13 +1,9 @@
 // Rewriting files: what is kept of the old file, which file is replaced, and what a failure leaves.
 #include "core/detail/file_rewrite.h"
 
-#include "tavo_error.h"
-
 #include "core/detail/file_append.h"
 #include "core/detail/file_target.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
+#include "support/test.h"
 
 #include <sys/xattr.h>
 

@@ -3,12 +3,9 @@
 
 #include "core/detail/open_file.h"
 #include "support/descriptors.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
+#include "support/test.h"
 
 #include <dlfcn.h>
-#include <sys/stat.h>
 
 namespace {
 

@@ -1,7 +1,7 @@
 // The lines of settings files: which key a line sets, to what, and what may be written.
 #include "core/detail/key_value_line.h"
 
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 using namespace std::string_view_literals;
 

@@ -2,9 +2,7 @@
 #include "core/detail/line_reader.h"
 
 #include "core/detail/open_file.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
+#include "support/test.h"
 
 #include <thread>
 

@@ -1,9 +1,7 @@
 // Codes, and values or codes, as they travel inside the library.
 #include "core/detail/result.h"
 
-#include <gtest/gtest.h>
-
-#include <memory>
+#include "support/test.h"
 
 namespace {
 

@@ -3,21 +3,9 @@
 
 #include "core/detail/command_output.h"
 #include "core/detail/log.h"
-#include "support/captured_log.h"
 #include "support/descriptors.h"
 #include "support/own_child.h"
-#include "support/scratch_dir.h"
-
-#include <gtest/gtest.h>
-
-#include <csignal>
-#include <cstdlib>
-#include <string>
-#include <vector>
-
-#include <fcntl.h>
-#include <sys/wait.h>
-#include <unistd.h>
+#include "support/test.h"
 
 using tavo::CommandOutput;
 using tavo::RunCommand;

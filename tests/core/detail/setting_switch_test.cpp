@@ -1,15 +1,8 @@
 // Switches of settings files that cannot be read.
 #include "core/detail/setting_switch.h"
 
-#include "support/scratch_dir.h"
+#include "support/test.h"
 #include "support/traced_call.h"
-
-#include <gtest/gtest.h>
-
-#include <cerrno>
-#include <cstring>
-
-#include <unistd.h>
 
 namespace {
 

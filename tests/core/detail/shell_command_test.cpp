@@ -2,10 +2,7 @@
 #include "core/detail/shell_command.h"
 
 #include "core/detail/command_output.h"
-
-#include <gtest/gtest.h>
-
-#include <string>
+#include "support/test.h"
 
 using tavo::ComposedPiece;
 using tavo::ShellCommand;

@@ -1,7 +1,7 @@
 // Names in the user lists of Samba's settings file.
 #include "core/detail/smb_user_lists.h"
 
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 namespace {
 

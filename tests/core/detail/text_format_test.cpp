@@ -1,11 +1,6 @@
 // Log lines: formats with typed arguments. No argument can break out of its line.
 #include "core/detail/log.h"
-#include "support/captured_log.h"
-
-#include <gtest/gtest.h>
-
-#include <cerrno>
-#include <string>
+#include "support/test.h"
 
 namespace {
 

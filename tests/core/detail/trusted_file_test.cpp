@@ -1,13 +1,7 @@
 // The gate to files in directories in which everybody may create names.
 #include "core/detail/trusted_file.h"
 
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
-
-#include <functional>
-
-#include <sys/stat.h>
+#include "support/test.h"
 
 using testing::ElementsAre;
 using testing::IsEmpty;

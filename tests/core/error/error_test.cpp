@@ -1,16 +1,8 @@
 // The error state and the log file routines.
 #include "tavo_error.h"
 
-#include "support/captured_log.h"
-#include "support/fault_state.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 #include "support/text_lines.h"
-
-#include <gtest/gtest.h>
-
-#include <cerrno>
-#include <cstdio>
-#include <string>
 
 using test::Fault;
 using test::LastFault;

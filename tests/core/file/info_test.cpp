@@ -2,12 +2,7 @@
 #include "tavo_file.h"
 #include "tavo_lock.h"
 
-#include "support/fault_state.h"
-#include "support/scratch_dir.h"
-
-#include <gtest/gtest.h>
-
-#include <cstdio>
+#include "support/test.h"
 
 #include <dlfcn.h>
 

@@ -1,13 +1,7 @@
 // One key of a settings file: read, set, appended, removed.
 #include "tavo_file.h"
 
-#include "support/fault_state.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
-
-#include <sys/stat.h>
-#include <unistd.h>
+#include "support/test.h"
 
 using test::Fault;
 using test::ForgetFault;

@@ -1,12 +1,8 @@
 // Many keys of a settings file at once.
 #include "tavo_file.h"
 
-#include "support/captured_log.h"
-#include "support/fault_state.h"
 #include "support/owned_container.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
+#include "support/test.h"
 
 using test::Fault;
 using test::HashOf;

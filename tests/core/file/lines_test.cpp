@@ -1,17 +1,8 @@
 // Whole lines by number and by key, and the other edits of a whole file.
 #include "tavo_file.h"
 
-#include "support/fault_state.h"
 #include "support/owned_container.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
-
-#include <cstring>
-
-#include <fcntl.h>
-#include <sys/stat.h>
-#include <unistd.h>
+#include "support/test.h"
 
 using test::Fault;
 using test::LastFault;

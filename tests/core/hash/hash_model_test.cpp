@@ -2,8 +2,7 @@
 #include "tavo_hash.h"
 
 #include "support/container_text.h"
-
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 #include <random>
 

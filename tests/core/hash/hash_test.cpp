@@ -2,10 +2,8 @@
 #include "tavo_hash.h"
 
 #include "support/container_text.h"
-#include "support/fault_state.h"
 #include "support/owned_container.h"
-
-#include <gmock/gmock.h>
+#include "support/test.h"
 
 #include <climits>
 

@@ -2,12 +2,9 @@
 #include "tavo_list.h"
 
 #include "support/container_text.h"
+#include "support/test.h"
 
-#include <gtest/gtest.h>
-
-#include <algorithm>
 #include <cctype>
-#include <cstring>
 #include <random>
 
 namespace {

@@ -1,16 +1,10 @@
 // Lists: published numbers, orders, sets, refusals. list_model_test checks the effects of the single operations.
 #include "tavo_list.h"
 
-#include "support/captured_log.h"
 #include "support/container_text.h"
-#include "support/fault_state.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
-
-#include <algorithm>
 #include <climits>
-#include <cstring>
-#include <functional>
 
 using test::Fault;
 using test::Items;

@@ -1,18 +1,12 @@
 // Many processes compete for one lock.
 #include "tavo_lock.h"
 
-#include <gtest/gtest.h>
+#include "support/test.h"
 
-#include <algorithm>
-#include <csignal>
-#include <filesystem>
 #include <random>
-#include <vector>
 
 #include <sched.h>
 #include <sys/mman.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 namespace {
 

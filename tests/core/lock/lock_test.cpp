@@ -1,36 +1,18 @@
 // The locks: counting, refusals, time-outs, forked children, and traps in /tmp.
 #include "tavo_lock.h"
 
-#include "support/appliance_root.h"
-#include "support/captured_log.h"
 #include "support/descriptors.h"
-#include "support/eventually.h"
 #include "support/failing_malloc.h"
-#include "support/fault_state.h"
 #include "support/own_child.h"
 #include "support/planted_name.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
-
-#include <cerrno>
 #include <climits>
-#include <cstdlib>
-#include <cstring>
 #include <ctime>
-#include <filesystem>
-#include <fstream>
-#include <functional>
-#include <string>
-#include <vector>
 
-#include <fcntl.h>
 #include <sys/file.h>
 #include <sys/prctl.h>
-#include <sys/stat.h>
 #include <sys/syscall.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 namespace fs = std::filesystem;
 using test::Fault;

@@ -3,22 +3,13 @@
 #include "tavo_proc.h"
 
 #include "support/descriptors.h"
-#include "support/fault_state.h"
 #include "support/own_child.h"
-#include "support/scratch_dir.h"
-
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 #include <cstdarg>
-#include <cstdlib>
-#include <functional>
-#include <string>
-#include <vector>
 
 #include <dlfcn.h>
-#include <fcntl.h>
 #include <sys/resource.h>
-#include <sys/stat.h>
 #include <sys/syscall.h>
 
 using test::ChildAction;

@@ -1,18 +1,10 @@
 // Pid files, and signals to the processes that they name.
 #include "tavo_proc.h"
 
-#include "support/eventually.h"
-#include "support/fault_state.h"
 #include "support/own_child.h"
-#include "support/scratch_dir.h"
-
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 #include <climits>
-#include <string>
-#include <vector>
-
-#include <sys/stat.h>
 
 using test::Fault;
 using test::LastFault;

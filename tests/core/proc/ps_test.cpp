@@ -1,28 +1,13 @@
 // Finding processes, with a ps that knows -I and with one that does not.
 #include "tavo_proc.h"
 
-#include "support/appliance_root.h"
 #include "support/descriptors.h"
-#include "support/eventually.h"
 #include "support/failing_malloc.h"
-#include "support/fault_state.h"
 #include "support/own_child.h"
 #include "support/planted_name.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
-
-#include <algorithm>
-#include <cstdio>
-#include <cstring>
-#include <filesystem>
-#include <functional>
-#include <memory>
-#include <string>
-#include <vector>
+#include "support/test.h"
 
 #include <sys/mman.h>
-#include <sys/stat.h>
 #include <sys/syscall.h>
 
 using test::Fault;

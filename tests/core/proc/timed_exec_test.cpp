@@ -2,25 +2,13 @@
 #include "tavo_lock.h"
 #include "tavo_proc.h"
 
-#include "support/appliance_root.h"
-#include "support/captured_log.h"
-#include "support/eventually.h"
-#include "support/fault_state.h"
 #include "support/own_child.h"
-#include "support/scratch_dir.h"
-
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 #include <chrono>
 #include <climits>
-#include <functional>
-#include <memory>
-#include <string>
-#include <vector>
 
-#include <fcntl.h>
 #include <sys/resource.h>
-#include <sys/stat.h>
 #include <sys/syscall.h>
 #include <syslog.h>
 

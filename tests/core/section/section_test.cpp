@@ -1,15 +1,8 @@
 // Files with sections: headers, reading, rewriting, appending.
 #include "tavo_section.h"
 
-#include "support/fault_state.h"
 #include "support/owned_container.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
-
-#include <cstring>
-
-#include <sys/stat.h>
+#include "support/test.h"
 
 using test::Fault;
 using test::HashOf;

@@ -1,15 +1,10 @@
 // Tokens, trimming, colon encoding, and UTF-8 without regard to case.
 #include "tavo_str.h"
 
-#include "support/fault_state.h"
-
-#include <gmock/gmock.h>
+#include "support/test.h"
 
 #include <climits>
-#include <cstring>
 #include <random>
-#include <string>
-#include <vector>
 
 using test::Fault;
 using test::LastFault;

@@ -8,21 +8,11 @@
 
 #include "account/group/group_fixture.h"
 #include "account/known_everywhere.h"
-#include "support/captured_log.h"
 #include "support/failing_malloc.h"
+#include "support/test.h"
 #include "support/traced_call.h"
 
-#include <gtest/gtest.h>
-
-#include <cstring>
-#include <functional>
-#include <set>
-#include <string_view>
-
-#include <fcntl.h>
 #include <sys/mman.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 // Hashes take their salt from the clock.
 extern "C" time_t time(time_t *out) noexcept

@@ -6,10 +6,8 @@
 
 #include "support/container_text.h"
 #include "support/failing_malloc.h"
-#include "support/fault_state.h"
 #include "support/owned_container.h"
-
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 using test::Fault;
 using test::Hash;

@@ -1,13 +1,8 @@
 // Users, groups, quotas and their stores: alice and bob, who are in the group staff.
 #include "arguments.h"
-#include "support/captured_log.h"
-
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 #include <ctime>
-#include <filesystem>
-
-#include <fcntl.h>
 
 namespace every_call {
 namespace {

@@ -2,29 +2,14 @@
 // full one, another user's file, a busy process and a signal; then each of its allocations. Whatever fails, the process
 // lives, no file is half written, and the caller learns the truth.
 #include "call.h"
-#include "support/appliance_root.h"
-#include "support/captured_log.h"
 #include "support/descriptors.h"
 #include "support/failing_malloc.h"
 #include "support/file_snapshot.h"
 #include "support/rounds.h"
+#include "support/test.h"
 #include "support/traced_call.h"
 
-#include <gmock/gmock.h>
-
-#include <algorithm>
-#include <cerrno>
-#include <csignal>
-#include <cstring>
-#include <fstream>
-#include <iterator>
-#include <map>
-#include <set>
-
-#include <fcntl.h>
 #include <sys/mman.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 using every_call::Call;
 using every_call::Family;

@@ -1,18 +1,8 @@
 // Services: two volumes, the web service bound to the first, and a pid file that names this process as its daemon.
 #include "arguments.h"
-#include "support/appliance_root.h"
-#include "support/captured_log.h"
-#include "support/scratch_dir.h"
-
-#include <gtest/gtest.h>
-
-#include <cerrno>
-#include <cstring>
-#include <filesystem>
+#include "support/test.h"
 
 #include <sys/mount.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 namespace every_call {
 namespace {

@@ -2,16 +2,11 @@
 // The call is refused with its code under its own name, before it looks at the appliance.
 #include "tavosdk.h"
 
-#include "support/fault_state.h"
-
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 #include <concepts>
-#include <cstring>
 #include <tuple>
 #include <type_traits>
-#include <utility>
-#include <vector>
 
 namespace {
 

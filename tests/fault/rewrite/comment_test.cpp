@@ -3,18 +3,9 @@
 #include "tavo_file.h"
 
 #include "interposed_calls.h"
-#include "support/appliance_root.h"
 #include "support/failing_malloc.h"
-#include "support/fault_state.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 #include "writers.h"
-
-#include <gtest/gtest.h>
-
-#include <cerrno>
-
-#include <sys/stat.h>
-#include <unistd.h>
 
 using test::Call;
 

@@ -1,15 +1,7 @@
 // A process that dies in the middle of a rewrite: the file is the old one or the new one.
 #include "interposed_calls.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 #include "writers.h"
-
-#include <gmock/gmock.h>
-
-#include <csignal>
-
-#include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 using test::kOldText;
 

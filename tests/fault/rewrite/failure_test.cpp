@@ -1,24 +1,13 @@
 // Calls that fail and disks that are full: every writer reports its code and leaves the old text, and no other file.
-#include "tavo_error.h"
 #include "tavo_lock.h"
 #include "tavo_proc.h"
 
 #include "interposed_calls.h"
-#include "support/appliance_root.h"
-#include "support/captured_log.h"
 #include "support/descriptors.h"
-#include "support/fault_state.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 #include "writers.h"
 
-#include <gmock/gmock.h>
-
-#include <cerrno>
-
-#include <fcntl.h>
 #include <sys/mount.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 using test::Call;
 using test::Fault;

@@ -1,15 +1,9 @@
 // Memory runs out at any allocation: a published line, and published log lines, which every_call/ does not look at.
 #include "tavo_file.h"
 
-#include "support/captured_log.h"
 #include "support/failing_malloc.h"
-#include "support/fault_state.h"
 #include "support/owned_container.h"
-#include "support/scratch_dir.h"
-
-#include <gtest/gtest.h>
-
-#include <algorithm>
+#include "support/test.h"
 
 namespace {
 

@@ -1,17 +1,10 @@
 // Traps where a rewrite looks: links, FIFOs, devices, directories, other users' files.
-#include "tavo_error.h"
 #include "tavo_proc.h"
 
-#include "support/fault_state.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 #include "writers.h"
 
-#include <gmock/gmock.h>
-
-#include <fcntl.h>
 #include <sys/file.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 using testing::ElementsAre;
 

@@ -5,28 +5,14 @@
 #include "tavo_service.h"
 
 #include "service_root.h"
-#include "support/fault_state.h"
 #include "support/own_child.h"
 #include "support/scenario.h"
-#include "support/scratch_dir.h"
 #include "support/stale_stack.h"
-
-#include <gmock/gmock.h>
-
-#include <algorithm>
-#include <cstdlib>
-#include <cstring>
-#include <filesystem>
-#include <fstream>
-#include <string>
-#include <vector>
+#include "support/test.h"
 
 #include <pwd.h>
 #include <sys/mount.h>
 #include <sys/prctl.h>
-#include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 using test::Fault;
 using test::FaultOf;

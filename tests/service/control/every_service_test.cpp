@@ -3,16 +3,8 @@
 #include "tavo_service.h"
 
 #include "service_root.h"
-#include "support/fault_state.h"
 #include "support/rounds.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
-
-#include <algorithm>
-#include <map>
-#include <string>
-#include <vector>
+#include "support/test.h"
 
 using test::DaemonPid;
 using test::Eventually;

@@ -3,13 +3,7 @@
 
 #include "service_root.h"
 #include "support/container_text.h"
-#include "support/fault_state.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
-
-#include <string>
-#include <vector>
+#include "support/test.h"
 
 using test::Fault;
 using test::FaultOf;

@@ -5,23 +5,9 @@
 #include "tavo_file.h"
 #include "tavo_service.h"
 
-#include "support/appliance_root.h"
-#include "support/captured_log.h"
-#include "support/eventually.h"
-
-#include <gtest/gtest.h>
-
-#include <cerrno>
-#include <csignal>
-#include <cstring>
-#include <filesystem>
-#include <fstream>
-#include <string>
-#include <vector>
+#include "support/test.h"
 
 #include <sys/mount.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 namespace test {
 

@@ -2,12 +2,7 @@
 #include "service/detail/process_named.h"
 #include "service/detail/service_table.h"
 #include "service/detail/volume_list.h"
-
-#include <gmock/gmock.h>
-
-#include <cstdio>
-#include <sstream>
-#include <string>
+#include "support/test.h"
 
 namespace {
 

@@ -3,33 +3,18 @@
 #include "tavo_proc.h"
 
 #include "packet.h"
-#include "support/appliance_root.h"
 #include "support/container_text.h"
-#include "support/eventually.h"
 #include "support/rounds.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 #include "support/text_lines.h"
 #include "support/virtual_cable.h"
 
-#include <gmock/gmock.h>
-
 #include <chrono>
-#include <csignal>
-#include <cstdlib>
-#include <cstring>
-#include <filesystem>
-#include <functional>
-#include <optional>
 #include <random>
-#include <set>
-#include <utility>
 
 #include <arpa/inet.h>
-#include <fcntl.h>
 #include <sys/file.h>
 #include <sys/socket.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 using test::Eventually;
 using test::Lines;

@@ -5,12 +5,7 @@
 
 #include "answer_budget.h"
 #include "host_table.h"
-
-#include <gmock/gmock.h>
-
-#include <cstdlib>
-#include <cstring>
-#include <map>
+#include "support/test.h"
 
 #include <arpa/inet.h>
 

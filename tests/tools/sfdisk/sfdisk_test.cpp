@@ -1,20 +1,9 @@
 // The appliance's partitioning tool, run on image files.
-#include "support/appliance_root.h"
 #include "support/running_program.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 #include "support/text_lines.h"
 
-#include <gmock/gmock.h>
-
 #include <cstdint>
-#include <iterator>
-#include <sstream>
-#include <string>
-#include <vector>
-
-#include <fcntl.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 namespace {
 

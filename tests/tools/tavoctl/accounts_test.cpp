@@ -1,22 +1,12 @@
 // tavoctl user, group and quota: their changes of the files, and refusals before any change.
 #include "run_tavoctl.h"
 #include "support/domain_entries.h"
-#include "support/eventually.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
-
-#include <csignal>
-#include <cstring>
-#include <filesystem>
-#include <sstream>
 
 #include <crypt.h>
 #include <sys/inotify.h>
-#include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
 #include <utmpx.h>
 
 namespace {

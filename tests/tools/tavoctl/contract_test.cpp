@@ -2,13 +2,9 @@
 #include "tavo_lock.h"
 
 #include "run_tavoctl.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
-
-#include <algorithm>
-#include <set>
 
 namespace {
 

@@ -1,16 +1,10 @@
 // The common parts of all verbs of tavoctl: exit statuses, refusals, tables and JSON, failures, questions, completion.
-#include "tavo_error.h"
 
 #include "run_tavoctl.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 #include "support/text_lines.h"
 
-#include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
-
-#include <filesystem>
-#include <fstream>
-#include <sstream>
 
 namespace {
 

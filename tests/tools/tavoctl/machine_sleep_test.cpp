@@ -1,12 +1,7 @@
 // Disks that sleep: what lists show comes from elsewhere, and nothing but the question whether they sleep reaches them.
 #include "run_tavoctl.h"
 #include "support/machine.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
-
-#include <fstream>
-#include <set>
+#include "support/test.h"
 
 namespace {
 

@@ -1,8 +1,8 @@
 // tavoctl disk, partition, raid and lvm on real disks: what is shown is what is there, and nothing in use is destroyed.
 #include "run_tavoctl.h"
 #include "support/machine.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
 
 namespace {

@@ -2,9 +2,8 @@
 // that is pulled, and back after everything was stopped.
 #include "run_tavoctl.h"
 #include "support/machine.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
 
 namespace {

@@ -2,14 +2,11 @@
 #include "tavo_lock.h"
 
 #include "run_tavoctl.h"
-#include "support/eventually.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
 
 #include <chrono>
-#include <filesystem>
 
 namespace {
 

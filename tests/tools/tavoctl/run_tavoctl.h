@@ -2,22 +2,12 @@
 #ifndef TESTS_TOOLS_TAVOCTL_RUN_TAVOCTL_H
 #define TESTS_TOOLS_TAVOCTL_RUN_TAVOCTL_H
 
-#include "support/appliance_root.h"
 #include "support/running_program.h"
+#include "support/test.h"
 
-#include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
-#include <csignal>
-#include <cstdlib>
-#include <string>
-#include <vector>
-
-#include <fcntl.h>
 #include <sys/ioctl.h>
-#include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 namespace test {
 

@@ -2,16 +2,11 @@
 #include "tavo_lock.h"
 
 #include "run_tavoctl.h"
-#include "support/eventually.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
 
-#include <filesystem>
-
 #include <sys/mount.h>
-#include <sys/stat.h>
 
 namespace {
 

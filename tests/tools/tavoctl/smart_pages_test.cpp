@@ -1,7 +1,7 @@
 // tavoctl's reading of the pages of a drive.
 #include "storage/smart_pages.h"
 
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 namespace {
 

@@ -3,12 +3,9 @@
 #include "support/captures.h"
 #include "support/hostile_names.h"
 #include "support/scenario.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
 #include <nlohmann/json.hpp>
-
-#include <filesystem>
 
 namespace {
 

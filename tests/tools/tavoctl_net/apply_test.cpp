@@ -2,12 +2,9 @@
 #include "tavo_net.h"
 
 #include "net_scene.h"
-#include "support/eventually.h"
 #include "support/rounds.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
-
-#include <filesystem>
 #include <random>
 #include <span>
 

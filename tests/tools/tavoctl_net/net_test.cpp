@@ -2,18 +2,11 @@
 #include "tavo_net.h"
 
 #include "net_scene.h"
-#include "support/eventually.h"
 #include "support/rounds.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
-
-#include <filesystem>
-#include <memory>
-#include <optional>
 #include <random>
-#include <sstream>
 
-#include <fcntl.h>
 #include <netinet/in.h>
 #include <sys/socket.h>
 

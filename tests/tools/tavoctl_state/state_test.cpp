@@ -1,12 +1,9 @@
 // tavoctl state: a document of one appliance makes another one the same, once; what is refused is refused before.
-#include "support/scratch_dir.h"
+#include "support/test.h"
 #include "support/virtual_cable.h"
 #include "tools/tavoctl/run_tavoctl.h"
 
-#include <gmock/gmock.h>
-
 #include <sys/mount.h>
-#include <sys/stat.h>
 
 using nlohmann::json;
 using test::Node;
