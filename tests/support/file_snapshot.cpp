@@ -1,15 +1,9 @@
 // The contents of some folders, as a value that can be compared and restored.
 #include "support/file_snapshot.h"
 
-#include "support/scratch_dir.h"
+#include "support/test.h"
 
 #include <climits>
-#include <filesystem>
-#include <fstream>
-#include <iterator>
-
-#include <fcntl.h>
-#include <unistd.h>
 
 namespace test {
 namespace {

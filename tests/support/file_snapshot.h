@@ -2,11 +2,7 @@
 #ifndef TESTS_SUPPORT_FILE_SNAPSHOT_H
 #define TESTS_SUPPORT_FILE_SNAPSHOT_H
 
-#include <map>
-#include <string>
-#include <vector>
-
-#include <sys/stat.h>
+#include "support/test.h"
 
 namespace test {
 

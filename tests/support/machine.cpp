@@ -1,13 +1,7 @@
 // The virtual appliance for tests.
 #include "support/machine.h"
 
-#include "support/appliance_root.h"
-#include "support/eventually.h"
-
-#include <cstdio>
-
-#include <sys/stat.h>
-#include <sys/wait.h>
+#include "support/test.h"
 
 namespace test {
 

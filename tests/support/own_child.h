@@ -2,11 +2,7 @@
 #ifndef TESTS_CORE_PROC_OWN_CHILD_H
 #define TESTS_CORE_PROC_OWN_CHILD_H
 
-#include <cerrno>
-#include <csignal>
-
-#include <sys/wait.h>
-#include <unistd.h>
+#include "support/test.h"
 
 // An appliance root that is entered by chroot alone has no /proc.
 #define SKIP_WITHOUT_PROC()                                                                                            \

@@ -2,9 +2,7 @@
 #ifndef TESTS_SUPPORT_RUNNING_PROGRAM_H
 #define TESTS_SUPPORT_RUNNING_PROGRAM_H
 
-#include <ostream>
-#include <string>
-#include <vector>
+#include "support/test.h"
 
 #include <sys/types.h>
 

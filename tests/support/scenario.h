@@ -3,10 +3,7 @@
 #ifndef TESTS_SUPPORT_SCENARIO_H
 #define TESTS_SUPPORT_SCENARIO_H
 
-#include <filesystem>
-#include <string>
-#include <string_view>
-#include <vector>
+#include "support/test.h"
 
 namespace test {
 

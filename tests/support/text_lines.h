@@ -2,9 +2,7 @@
 #ifndef TESTS_SUPPORT_TEXT_LINES_H
 #define TESTS_SUPPORT_TEXT_LINES_H
 
-#include <sstream>
-#include <string>
-#include <vector>
+#include "support/test.h"
 
 namespace test {
 

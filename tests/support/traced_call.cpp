@@ -1,10 +1,7 @@
 // Runs a piece of work in a child process under ptrace.
 #include "support/traced_call.h"
 
-#include <algorithm>
-#include <csignal>
-#include <iterator>
-#include <set>
+#include "support/test.h"
 
 #include <elf.h>
 #include <sys/ptrace.h>
@@ -12,8 +9,6 @@
 #include <sys/time.h>
 #include <sys/uio.h>
 #include <sys/user.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 namespace test {
 namespace {
@@ -23,40 +18,9 @@ struct NamedCall {
     const char *name;
 };
 
-#define ROW(name)                                                                                                      \
-    {                                                                                                                  \
-        SYS_##name, #name                                                                                              \
-    }
 constexpr NamedCall kNames[] = {
-    ROW(access),         ROW(bind),         ROW(brk),        ROW(capget),
-    ROW(chdir),          ROW(chmod),        ROW(chown),      ROW(clock_nanosleep),
-    ROW(clone),          ROW(close),        ROW(connect),    ROW(dup),
-    ROW(dup2),           ROW(dup3),         ROW(execve),     ROW(exit_group),
-    ROW(faccessat),      ROW(fchmod),       ROW(fchmodat),   ROW(fchown),
-    ROW(fcntl),          ROW(fdatasync),    ROW(flock),      ROW(fsync),
-    ROW(ftruncate),      ROW(futex),        ROW(getdents64), ROW(getegid),
-    ROW(geteuid),        ROW(getgid),       ROW(getpid),     ROW(getppid),
-    ROW(getrandom),      ROW(gettid),       ROW(getuid),     ROW(ioctl),
-    ROW(kill),           ROW(lchown),       ROW(link),       ROW(lseek),
-    ROW(lstat),          ROW(madvise),      ROW(mkdir),      ROW(mount),
-    ROW(mprotect),       ROW(mremap),       ROW(munmap),     ROW(nanosleep),
-    ROW(openat),         ROW(open),         ROW(pipe2),      ROW(truncate),
-    ROW(poll),           ROW(ppoll),        ROW(prctl),      ROW(pread64),
-    ROW(prlimit64),      ROW(pselect6),     ROW(pwrite64),   ROW(quotactl),
-    ROW(read),           ROW(readlink),     ROW(recvfrom),   ROW(recvmsg),
-    ROW(rename),         ROW(renameat2),    ROW(rmdir),      ROW(rt_sigaction),
-    ROW(rt_sigprocmask), ROW(rt_sigreturn), ROW(sendmsg),    ROW(sendto),
-    ROW(sethostname),    ROW(setsid),       ROW(setsockopt), ROW(socket),
-    ROW(stat),           ROW(statfs),       ROW(statx),      ROW(symlink),
-    ROW(sync),           ROW(tgkill),       ROW(umask),      ROW(uname),
-    ROW(unlink),         ROW(unlinkat),     ROW(utimensat),  ROW(vfork),
-    ROW(wait4),          ROW(waitid),       ROW(write),      ROW(writev),
-    ROW(mkdirat),        ROW(renameat),
-#ifdef SYS_newfstatat
-    ROW(newfstatat),
-#endif
+#include "system_call_names.h"
 };
-#undef ROW
 
 pid_t watched = 0;
 volatile bool timed_out = false;

@@ -10,11 +10,9 @@
 #ifndef TESTS_SUPPORT_TRACED_CALL_H
 #define TESTS_SUPPORT_TRACED_CALL_H
 
+#include "support/test.h"
+
 #include <cstdint>
-#include <functional>
-#include <ostream>
-#include <string>
-#include <vector>
 
 namespace test {
 

@@ -4,10 +4,7 @@
 #ifndef TESTS_SUPPORT_VIRTUAL_CABLE_H
 #define TESTS_SUPPORT_VIRTUAL_CABLE_H
 
-#include <functional>
-#include <memory>
-#include <string>
-#include <vector>
+#include "support/test.h"
 
 #include <sys/types.h>
 

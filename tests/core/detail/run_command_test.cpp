@@ -171,18 +171,15 @@ TEST(CommandOutput, Lines)
 // A daemon has closed its standard descriptors: the pipe must not get their numbers.
 TEST(CommandOutput, WithoutStandardDescriptors)
 {
-    const pid_t child = ::fork();
-    if (child == 0) {
-        for (int fd = 0; fd <= 2; ++fd)
-            ::close(fd);
-        CommandOutput output("echo x; cat; exit 6");
-        std::string line;
-        const bool read = output.Next(line) && line == "x" && !output.Next(line);
-        ::_exit(read && output.Status() == 6 && RunCommand("exit 7") == 7 ? 0 : 1);
-    }
-    int status = -1;
-    ::waitpid(child, &status, 0);
-    EXPECT_EQ(status, 0);
+    EXPECT_EQ(test::InChild([] {
+                  for (int fd = 0; fd <= 2; ++fd)
+                      ::close(fd);
+                  CommandOutput output("echo x; cat; exit 6");
+                  std::string line;
+                  const bool read = output.Next(line) && line == "x" && !output.Next(line);
+                  return read && output.Status() == 6 && RunCommand("exit 7") == 7 ? 0 : 1;
+              }),
+              0);
 }
 
 }  // namespace

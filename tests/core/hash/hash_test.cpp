@@ -244,11 +244,6 @@ TEST(Hash, RefusesWithOrWithoutACode)
     TLIBIHashDump(nullptr);
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS) << "none of these records a code";
 
-    EXPECT_EQ(TLIBSzHashPairNum(nullptr), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "hash_pair_num", 26}));
-    EXPECT_EQ(PshTLIBSzHashAlloc(-1), nullptr);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "hash_allocator"}));
-    EXPECT_EQ(PshTLIBIHashAllocator(-1, 9), nullptr);
     EXPECT_EQ(TLIBSzHashEnumKey(addr, &no_list), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "list_insert", 131}));
     EXPECT_EQ(Pairs(hash.get()), (PairMap{{"k", "v"}}));

@@ -327,61 +327,24 @@ TEST(ListDump, PrintsItemsAndHeader)
     EXPECT_EQ(testing::internal::GetCapturedStdout(), expected);
 }
 
+// Bad arguments are in the table of refusals; these are about what the lists are.
 TEST(List, RefusesAndChangesNothing)
 {
     const List list = MakeList({"a", "b"});
     const List sorted = MakeList({"a", "b"}, TLIB_SZLIST_SORTED);
     const List folded = MakeList({"a", "b"}, TLIB_SZLIST_CASESORTED);
-    TLIBSZLIST *null = nullptr;
     TLIBSZLIST *addr = list.get();
     TLIBSZLIST *sorted_addr = sorted.get();
-    char buffer[4];
     const Refusal rows[] = {
-        {PTR(SzTLIBSzListGet(nullptr, 0)), {ERR_BAD_PARAMETERS, "list_get", 30}},
-        {PTR(SzTLIBSzListGet(addr, -1)), {ERR_BAD_PARAMETERS, "list_get", 30}},
-        {PTR(SzTLIBSzListGet(addr, 2)), {ERR_BAD_PARAMETERS, "list_get", 30}},
-        {INT(TLIBSzListInsert(nullptr, 0, "x")), {ERR_BAD_PARAMETERS, "list_insert", 45}},
-        {INT(TLIBSzListInsert(&null, 0, "x")), {ERR_BAD_PARAMETERS, "list_insert", 45}},
-        {INT(TLIBSzListInsert(&addr, 0, nullptr)), {ERR_BAD_PARAMETERS, "list_insert", 45}},
-        {INT(TLIBSzListInsert(&addr, -1, "x")), {ERR_BAD_PARAMETERS, "list_insert", 45}},
         {INT(TLIBSzListInsert(&addr, INT_MAX, "x")), {ERR_OUT_OF_MEMORY, "list_insert", 72}},
         {INT(TLIBSzListInsert(&addr, 1 << 30, "x")), {ERR_OUT_OF_MEMORY, "list_insert", 72}},
-        {INT(TLIBSzListPush(&null, "x")), {ERR_BAD_PARAMETERS, "list_insert", 131}},
-        {INT(TLIBSzListPush(nullptr, "x")), {ERR_BAD_PARAMETERS, "list_insert", 131}},
-        {INT(TLIBSzListPush(&addr, nullptr)), {ERR_BAD_PARAMETERS, "list_insert", 131}},
-        {INT(TLIBSzListUnshift(nullptr, "x")), {ERR_BAD_PARAMETERS, "list_insert", 167}},
-        {INT(TLIBSzListUnshift(&addr, nullptr)), {ERR_BAD_PARAMETERS, "list_insert", 167}},
-        {PTR(SzTLIBSzListRemove(nullptr, 0)), {ERR_BAD_PARAMETERS, "list_remove", 40}},
-        {PTR(SzTLIBSzListRemove(addr, 2)), {ERR_BAD_PARAMETERS, "list_remove", 40}},
-        {PTR(SzTLIBSzListRemove(addr, -1)), {ERR_BAD_PARAMETERS, "list_remove", 40}},
-        {PTR(SzTLIBSzListShift(nullptr)), {ERR_BAD_PARAMETERS, "list_remove", 78}},
-        {PTR(SzTLIBSzListPop(nullptr)), {ERR_BAD_PARAMETERS, "list_remove", 110}},
-        {INT(TLIBSzListSet(nullptr, 0, "x")), {ERR_BAD_PARAMETERS, "list_set"}},
-        {INT(TLIBSzListSet(&null, 0, "x")), {ERR_BAD_PARAMETERS, "list_set"}},
-        {INT(TLIBSzListSet(&addr, 2, "x")), {ERR_BAD_PARAMETERS, "list_set"}},
-        {INT(TLIBSzListSet(&addr, 0, nullptr)), {ERR_BAD_PARAMETERS, "list_set"}},
-        {INT(TLIBSzListFind(nullptr, "a")), {ERR_BAD_PARAMETERS, "list_find", 37}},
-        {INT(TLIBSzListFind(addr, nullptr)), {ERR_BAD_PARAMETERS, "list_find", 37}},
         {INT(TLIBSzListFind(folded.get(), "a")), {ERR_BAD_PARAMETERS, "list_find", 37}},
-        {INT(TLIBSzListCaseFind(nullptr, "a")), {ERR_BAD_PARAMETERS, "list_case_find", 46}},
         {INT(TLIBSzListCaseFind(sorted.get(), "a")), {ERR_BAD_PARAMETERS, "list_case_find", 46}},
-        {INT(TLIBSzListSorted(nullptr)), {ERR_BAD_PARAMETERS, "list_sorted", 26}},
-        {PTR(PslTLIBSzListAnd(nullptr, addr, 0)), {ERR_BAD_PARAMETERS, "list_and", 59}},
-        {PTR(PslTLIBSzListAnd(addr, nullptr, 0)), {ERR_BAD_PARAMETERS, "list_and", 59}},
         {PTR(PslTLIBSzListAnd(sorted.get(), folded.get(), 0)), {ERR_BAD_PARAMETERS, "list_and", 69}},
         {PTR(PslTLIBSzListAnd(addr, sorted.get(), 1)), {ERR_BAD_PARAMETERS, "list_and"}},
-        {PTR(PslTLIBSzListOr(&null, addr, 0)), {ERR_BAD_PARAMETERS, "list_or", 61}},
-        {PTR(PslTLIBSzListOr(&addr, nullptr, 0)), {ERR_BAD_PARAMETERS, "list_or", 61}},
         {PTR(PslTLIBSzListOr(&sorted_addr, folded.get(), 0)), {ERR_BAD_PARAMETERS, "list_or", 73}},
-        {PTR(PslTLIBSzListSub(nullptr, addr, 0)), {ERR_BAD_PARAMETERS, "list_sub", 58}},
         {PTR(PslTLIBSzListSub(sorted.get(), folded.get(), 0x1000)), {ERR_BAD_PARAMETERS, "list_sub", 68}},
         {PTR(PslTLIBSzListSub(addr, sorted.get(), 0x1001)), {ERR_BAD_PARAMETERS, "list_sub"}},
-        {INT(TLIBSzListDump2Str(nullptr, ",", buffer, 4)), {ERR_BAD_PARAMETERS, "list_dump_2_str", 36}},
-        {INT(TLIBSzListDump2Str(addr, nullptr, buffer, 4)), {ERR_BAD_PARAMETERS, "list_dump_2_str", 36}},
-        {INT(TLIBSzListDump2Str(addr, ",", nullptr, 4)), {ERR_BAD_PARAMETERS, "list_dump_2_str", 36}},
-        {INT(TLIBSzListDump2Str(addr, ",", buffer, 0)), {ERR_BAD_PARAMETERS, "list_dump_2_str", 36}},
-        {INT(TLIBISzListFind(nullptr, 0, 0, "a", 0)), {ERR_BAD_PARAMETERS, "list_find"}},
-        {PTR(PslTLIBISzListExpand(nullptr)), {ERR_BAD_PARAMETERS, "list_expand"}},
         // Finding nothing is not a failure.
         {INT(TLIBSzListFind(addr, "x")), {}},
         {INT(TLIBSzListFind(sorted.get(), "x")), {}},
@@ -394,12 +357,13 @@ TEST(List, RefusesAndChangesNothing)
         log.Clear();
         EXPECT_TRUE(row.call()) << row.name;
         EXPECT_EQ(LastFault(), row.fault) << row.name;
-        EXPECT_THAT(log.Texts(),
-                    row.fault.module == "list_dump_2_str" ? Texts{"list_dump_2_str:37 Parameter error"} : Texts{});
+        EXPECT_THAT(log.Texts(), IsEmpty());
         EXPECT_EQ(addr, list.get());
         for (const List *untouched : {&list, &sorted, &folded})
             ASSERT_THAT(Items(untouched->get()), ElementsAre("a", "b")) << row.name;
     }
+    EXPECT_EQ(TLIBSzListDump2Str(addr, ",", nullptr, 4), -1);
+    EXPECT_THAT(log.Texts(), ElementsAre("list_dump_2_str:37 Parameter error"));
     TLIBSzListFree(nullptr);
     TLIBSzListRemoveAll(nullptr);
     TLIBSzListSortItems(nullptr, 1);

@@ -4,12 +4,9 @@
 
 #include "call.h"
 #include "support/owned_container.h"
+#include "support/test.h"
 
-#include <string>
-#include <string_view>
 #include <type_traits>
-#include <utility>
-#include <vector>
 
 namespace every_call {
 

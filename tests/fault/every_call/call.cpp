@@ -2,12 +2,8 @@
 #include "call.h"
 
 #include "support/failing_malloc.h"
+#include "support/test.h"
 #include "support/traced_call.h"
-
-#include <algorithm>
-#include <cerrno>
-#include <cstdio>
-#include <cstring>
 
 namespace every_call {
 

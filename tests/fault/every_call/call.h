@@ -13,13 +13,9 @@
 
 #include "tavosdk.h"
 
-#include <functional>
-#include <memory>
-#include <ostream>
-#include <string>
-#include <string_view>
+#include "support/test.h"
+
 #include <type_traits>
-#include <vector>
 
 namespace every_call {
 

@@ -1,13 +1,6 @@
 // The core: error state, containers, texts, settings files, locks, processes, and what the appliance says of itself.
 #include "arguments.h"
-#include "support/captured_log.h"
-#include "support/scratch_dir.h"
-
-#include <csignal>
-#include <cstdlib>
-#include <filesystem>
-
-#include <unistd.h>
+#include "support/test.h"
 
 namespace every_call {
 namespace {

@@ -1,20 +1,14 @@
 // Interfaces, routes, bonds and discovery: one card with an address, as the kernel shows it.
 #include "arguments.h"
 #include "network/card_record.h"
-#include "support/captured_log.h"
 #include "support/device_tree.h"
 #include "support/recorded_calls.h"
-#include "support/scratch_dir.h"
-
-#include <cerrno>
-#include <cstring>
-#include <filesystem>
+#include "support/test.h"
 
 #include <arpa/inet.h>
 #include <net/if.h>
 #include <sys/ioctl.h>
 #include <sys/syscall.h>
-#include <unistd.h>
 
 namespace every_call {
 namespace {

@@ -47,8 +47,8 @@ const TAVOSERVICE *Row(const char *name)
 }
 
 // An action handler, and a status handler.
-#define ACTION(name, row) CALL(name, kAnswers, Row(row), int{TAVO_SERVICE_ENABLE})
-#define STATUS(name, row) CALL(name, kAnswers, Row(row))
+#define HANDLER(name, row) CALL(name, kAnswers, Row(row), int{TAVO_SERVICE_ENABLE})
+#define STATUS(name, row)  CALL(name, kAnswers, Row(row))
 
 }  // namespace
 
@@ -58,10 +58,10 @@ Family ServiceFamily()
         "Services",
         {
             CALL(TAVONetService, kAnswers, TAVO_DAEMON_CRON | TAVO_DAEMON_MDNS, int{TAVO_DAEMON_START}),
-            ACTION(TAVOServiceAFP, "afp"),
+            HANDLER(TAVOServiceAFP, "afp"),
             STATUS(TAVOServiceAFPStatus, "afp"),
             CALL(TAVOServiceActionSet, kSteps, 0, int{TAVO_SERVICE_ENABLE}),
-            ACTION(TAVOServiceAudio, "audio"),
+            HANDLER(TAVOServiceAudio, "audio"),
             CALL(TAVOServiceDaemonGet, 0, "photo"),
             CALL(TAVOServiceDaemonIDGet, 0, 0),
             CALL(TAVOServiceDataSearch, kAnswers, 1, Text<52>(), 52),
@@ -70,7 +70,7 @@ Family ServiceFamily()
             STATUS(TAVOServiceFTPStatus, "ftp"),
             CALL(TAVOServiceGetAll, kAnswers, ListOf({})),
             CALL(TAVOServiceGetbyVolume, kAnswers, kVolumes[0], ListOf({})),
-            ACTION(TAVOServiceHTTPS, "https"),
+            HANDLER(TAVOServiceHTTPS, "https"),
             CALL(TAVOServiceIndexGet, 0, "DB"),
             CALL(TAVOServiceInfoGet, 0, 0),
             CALL(TAVOServiceIsOnVolume, kAnswers, 1, kVolumes[0]),
@@ -78,7 +78,7 @@ Family ServiceFamily()
             CALL(TAVOServiceLinkRemove, 0, 1),
             CALL(TAVOServiceLinkSet, 0, 1, "/volume2/web"),
             CALL(TAVOServiceNameGet, 0, 0),
-            ACTION(TAVOServiceNetBkp, "netbkp"),
+            HANDLER(TAVOServiceNetBkp, "netbkp"),
             CALL(TAVOServiceNewVolumeDecide, kAnswers, 2, Text<52>(), 52),
             CALL(TAVOServiceOnOffALL, kAnswers, 0),
             STATUS(TAVOServicePrinterStatus, "printer"),
@@ -90,8 +90,8 @@ Family ServiceFamily()
             CALL(TAVOServiceRemovebyVolume, kAnswers, kVolumes[0], 0),
             CALL(TAVOServiceRestartfromVolumeNone, kAnswers),
             CALL(TAVOServiceRestore, kAnswers, kVolumes[0]),
-            ACTION(TAVOServiceSAMBA, "samba"),
-            ACTION(TAVOServiceSSH, "ssh"),
+            HANDLER(TAVOServiceSAMBA, "samba"),
+            HANDLER(TAVOServiceSSH, "ssh"),
             STATUS(TAVOServiceSSHStatus, "ssh"),
             CALL(TAVOServiceSTDAction, 0, Row("photo"), int{TAVO_SERVICE_ENABLE}),
             CALL(TAVOServiceSTDStatus, kAnswers, Row("web")),
@@ -105,7 +105,7 @@ Family ServiceFamily()
             CALL(TAVOServiceShareRemove, 0, 1, 0),
             CALL(TAVOServiceShareUpdate, 0, 1, kVolumes[1]),
             CALL(TAVOServiceStatusGet, kAnswers, 0),
-            ACTION(TAVOServiceTelnet, "telnet"),
+            HANDLER(TAVOServiceTelnet, "telnet"),
             STATUS(TAVOServiceTelnetStatus, "telnet"),
             CALL(TAVOServiceThirdPartyAll, kAnswers, "start"),
             CALL(TAVOServiceTypeGet, 0, 0),
@@ -113,7 +113,7 @@ Family ServiceFamily()
             CALL(TAVOServiceVolumeChange, 0, 2, kVolumes[1]),
             CALL(TAVOServiceVolumeGetbyLink, kAnswers, "/var/services/web", Text<52>(), 52, Text<52>(), 52),
             CALL(TAVOServiceVolumeGetbyShare, 0, "web", Text<52>(), 52),
-            ACTION(TAVOServiceiTunes, "itunes"),
+            HANDLER(TAVOServiceiTunes, "itunes"),
             STATUS(TAVOServiceiTunesStatus, "itunes"),
         },
         [] { return std::make_shared<Services>(); },

@@ -1,22 +1,15 @@
 // Disks, partitions, arrays and volume groups: two disks with a mirror and a volume group on it, as the kernel shows them.
 #include "arguments.h"
-#include "support/captured_log.h"
 #include "support/device_tree.h"
 #include "support/recorded_calls.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 
-#include <cerrno>
-#include <cstdlib>
-#include <cstring>
-
-#include <fcntl.h>
 #include <linux/fs.h>
 #include <linux/hdreg.h>
 #include <linux/major.h>
 #include <linux/raid/md_u.h>
 #include <scsi/sg.h>
 #include <sys/syscall.h>
-#include <unistd.h>
 
 namespace every_call {
 namespace {

@@ -26,6 +26,13 @@ struct Argument {
     std::vector<T> bad;
 };
 
+// The module, and a published line after a colon.
+test::Fault BadParameters(const std::string &place)
+{
+    const size_t colon = std::min(place.find(':'), place.size());
+    return {ERR_BAD_PARAMETERS, place.substr(0, colon), std::atoi(place.c_str() + std::min(colon + 1, place.size()))};
+}
+
 template <typename Result, typename... Types>
 void Refuses(const char *module, Result (*function)(Types...), std::type_identity_t<Argument<Types>>... arguments)
 {
@@ -35,8 +42,7 @@ void Refuses(const char *module, Result (*function)(Types...), std::type_identit
             std::get<at>(values) = argument.bad[i];
             test::ForgetFault();
             const Result result = std::apply(function, values);
-            EXPECT_EQ(test::LastFault(), (test::Fault{ERR_BAD_PARAMETERS, module}))
-                << "argument " << at << ", value " << i;
+            EXPECT_EQ(test::LastFault(), BadParameters(module)) << "argument " << at << ", value " << i;
             if constexpr (std::is_pointer_v<Result>)
                 EXPECT_EQ(result, nullptr) << module;
             else
@@ -62,6 +68,7 @@ class Refusals : public testing::Test {
   protected:
     ~Refusals() override
     {
+        EXPECT_EQ(list_->nItem + hash_->nPair, 0) << "a refused call changes nothing";
         TLIBSzListFree(list_);
         TLIBSzHashFree(hash_);
     }
@@ -72,16 +79,20 @@ class Refusals : public testing::Test {
 
 TEST_F(Refusals, Core)
 {
+    Refuses("error_log_set:33", TLIBErrLogSet, "/none/log", "x");
     Refuses("file_add_line", TLIBFileAddLine, "/none", {0, -1}, "x");
     Refuses("file_add_line_by_key", TLIBFileAddLineByKey, "/none", "key", "x");
     Refuses("file_append_key", TLIBFileAppendKey, "/none", "key", "x", {MayBeNull(), nullptr, "%d"});
     Refuses("file_check_key_value", BlTAVOFileCheckKeyValue, "/none", "key", "x");
     Refuses("file_comment", TLIBFileComment, "/none", "key");
     Refuses("file_get_keys", TLIBFileGetKeys, "/none", {MayBeNull(), list_}, {&hash_, &no_hash}, "=");
-    Refuses("file_get_section", TLIBFileGetSection, "/none", "part", {&hash_, &no_hash});
+    Refuses("file_get_key_value:52", TLIBFileGetKeyValue, "/none", "key", {MayBeNull(), text}, 16, {0, -1});
+    Refuses("file_get_line", TLIBFileGetLine, "/none", {1, 0}, text, 64);
+    Refuses("file_get_line_by_key", TLIBFileGetLineByKey, "/none", "key", {MayBeNull(), text}, 64);
+    Refuses("file_get_section:54", TLIBFileGetSection, "/none", "part", {&hash_, &no_hash});
     Refuses("file_enum_section", TLIBFileEnumSection, "/none", {&list_, &no_list});
     Refuses("file_match_line_no", TLIBFileMatchLineNo, "/none", "key");
-    Refuses("file_match_section", TLIBIFileMatchSection, "[part]", 6, "part");
+    Refuses("file_match_section:33", TLIBIFileMatchSection, "[part]", 6, "part");
     Refuses("file_modify_section", TLIBIFileModifySection, "/none", "part", {MayBeNull(), nullptr},
             {MayBeNull(), hash_}, 0, {MayBeNull(), nullptr});
     Refuses("file_add_section", ErrTLIBFileAddSection, "/none", "part", hash_, {MayBeNull(), nullptr});
@@ -94,6 +105,7 @@ TEST_F(Refusals, Core)
     Refuses("file_set_line_by_key", TLIBFileSetLineByKey, "/none", "key", "x");
     Refuses("file_touch", TLIBFileTouch, "/none/file");
     Refuses("file_utf8bom_strip", TLIBFileUTF8BomStrip, "/none");
+    Refuses("proc_signal_by_pid_file", TLIBProcAliveByPidFile, "/none");
     Refuses("proc_signal_by_pid_file", TLIBProcSignalByPidFile, "/none", {0, -1});
     Refuses("ps", TLIBPs, "none", {MayBeNull(), nullptr}, {0, 1});
     Refuses("read_pid_file", TLIBReadPidFile, "/none");
@@ -103,8 +115,26 @@ TEST_F(Refusals, Core)
     Refuses("str_trim_space", TLIBStrTrimSpace, text, {MayBeNull(), text});
     Refuses("unicode_utf8_str_upper", TLIBUnicodeUTF8StrUpper, "a", text, {64, -1});
     Refuses("unicode_utf8_str_count_char", TLIBUnicodeUTF8StrCountChar, {"a", "\xff"});
-    Refuses("list_case_find", TLIBSzListCaseFind, list_, "a");
-    Refuses("list_dump_2_str", TLIBSzListDump2Str, list_, ",", text, {64, 0});
+    Refuses("list_and:59", PslTLIBSzListAnd, list_, list_, 0);
+    Refuses("list_case_find:46", TLIBSzListCaseFind, list_, "a");
+    Refuses("list_dump_2_str:36", TLIBSzListDump2Str, list_, ",", text, {64, 0});
+    Refuses("list_expand", PslTLIBISzListExpand, list_);
+    Refuses("list_find:37", TLIBSzListFind, list_, "a");
+    Refuses("list_find", TLIBISzListFind, list_, 0, 0, "a", 0);
+    Refuses("list_get:30", SzTLIBSzListGet, list_, {1, -1, 0});
+    Refuses("list_insert:45", TLIBSzListInsert, {&list_, &no_list}, {0, -1}, "x");
+    Refuses("list_insert:131", TLIBSzListPush, {&list_, &no_list}, "x");
+    Refuses("list_insert:167", TLIBSzListUnshift, {&list_, &no_list}, "x");
+    Refuses("list_or:61", PslTLIBSzListOr, {&list_, &no_list}, list_, 0);
+    Refuses("list_remove:40", SzTLIBSzListRemove, list_, {1, -1, 0});
+    Refuses("list_remove:78", SzTLIBSzListShift, list_);
+    Refuses("list_remove:110", SzTLIBSzListPop, list_);
+    Refuses("list_set", TLIBSzListSet, {&list_, &no_list}, {1, -1, 0}, "x");
+    Refuses("list_sorted:26", TLIBSzListSorted, list_);
+    Refuses("list_sub:58", PslTLIBSzListSub, list_, list_, 0);
+    Refuses("hash_allocator", PshTLIBSzHashAlloc, {1, -1});
+    Refuses("hash_allocator", PshTLIBIHashAllocator, {1, -1}, 9);
+    Refuses("hash_pair_num:26", TLIBSzHashPairNum, hash_);
 }
 
 TEST_F(Refusals, Storage)

@@ -4,6 +4,7 @@
 
 #include "interposed_calls.h"
 #include "support/descriptors.h"
+#include "support/failing_malloc.h"
 #include "support/test.h"
 #include "writers.h"
 
@@ -106,6 +107,98 @@ TEST(FailingCalls, OfTheSystemSettingsReleaseTheirLock)
     EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, "file_set_key_value"}));
     EXPECT_EQ(rgslckList[0].pfLock, nullptr);
     EXPECT_EQ(test::ReadFile("/etc/tavoinfo.conf"), "runsamba=no\n");
+}
+
+// On the file system of /etc/skel a comment begins in a scratch file there. Without its lock that file is not used, and the
+// file is rewritten like any other.
+TEST(Comment, ComesFromTheScratchFileThatItCouldLock)
+{
+    if (test::RootForm().empty())
+        GTEST_SKIP() << "only in an appliance root";
+    const test::Place dir("/etc");
+    const std::string file = dir / "file";
+    const std::string commented = std::string(kOldText).insert(kOldText.find("key"), ";");
+    for (const int error : {0, EIO, ENOLCK, ENOSYS}) {
+        test::WriteFile(file, kOldText);
+        test::FailCalls(error ? Call::flock : Call::none, error);
+        EXPECT_EQ(TLIBFileComment(file.c_str(), "key"), 1) << error;
+        test::FailCalls(Call::none, 0);
+        EXPECT_EQ(std::string(test::RenamedFrom()) == test::kScratch, error == 0) << test::RenamedFrom();
+        EXPECT_EQ(test::ReadFile(file), commented) << error;
+        EXPECT_THAT(dir.Names(), ElementsAre("file")) << error;
+    }
+    test::EachAllocation faults;
+    while (faults.Next()) {
+        test::WriteFile(file, kOldText);
+        test::ForgetFault();
+        faults.Arm();
+        const int result = TLIBFileComment(file.c_str(), "key");
+        faults.Disarm();
+        EXPECT_EQ(result, faults.Fired() ? -1 : 1);
+        EXPECT_EQ(TLIBErrGet(), faults.Fired() ? ERR_OUT_OF_MEMORY : ERR_SUCCESS);
+        EXPECT_EQ(test::ReadFile(file), faults.Fired() ? kOldText : commented);
+        EXPECT_EQ(faults.LeftAllocated(), 0);
+        EXPECT_THAT(dir.Names(), ElementsAre("file"));
+    }
+    EXPECT_GT(faults.Count(), 2);
+}
+
+// Memory runs out: a published line, and published log lines, which every_call/ does not look at.
+TEST(OutOfMemory, OpensNoTemporaryFile)
+{
+    const test::ScratchDir dir;
+    test::EachAllocation faults;
+    while (faults.Next()) {
+        std::string name = dir / "temp.XXXXXX";
+        faults.Arm();
+        FILE *temp = TLIBFileTempFileOpen(name.data());
+        faults.Disarm();
+        EXPECT_EQ(temp == nullptr, faults.Fired());
+        if (temp) {
+            std::fclose(temp);
+            continue;
+        }
+        EXPECT_EQ(test::LastFault(), (test::Fault{ERR_OPEN_FAILED, "file_tempfile_open", 49})) << "a published line";
+        EXPECT_EQ(dir.Names().size(), 0u);
+    }
+    EXPECT_GT(faults.Count(), 0);
+}
+
+// Support staff know these lines.
+TEST(OutOfMemory, IsLoggedByTheFunctionsOfManyKeys)
+{
+    const test::ScratchDir dir;
+    const std::string file = dir / "file";
+    test::PairMap many;
+    for (int i = 0; i < 100; ++i)
+        many["key number " + std::to_string(i)] = "v";
+    const test::Owned<TLIBSZHASH> pairs = test::HashOf(many);
+    test::Owned<TLIBSZLIST> wanted = test::ListOf({});
+    ASSERT_EQ(TLIBSzHashEnumKey(pairs, wanted), 100);
+    test::WriteFile(file, "key number 1=old\n");
+    test::Owned<TLIBSZHASH> found = test::HashOf({});
+
+    const auto logs = [](const char *text, const auto &call) {
+        int logged = 0;
+        test::EachAllocation faults;
+        while (faults.Next()) {
+            test::CapturedLog log;
+            faults.Arm();
+            const int result = call();
+            faults.Disarm();
+            const auto texts = log.Texts();
+            if (std::any_of(texts.begin(), texts.end(),
+                            [&](const auto &line) { return line.find(text) != line.npos; })) {
+                ++logged;
+                EXPECT_EQ(result, -1);
+                EXPECT_EQ(TLIBErrGet(), ERR_OUT_OF_MEMORY);
+            }
+        }
+        EXPECT_GT(logged, 0) << text;
+    };
+    logs(" PslTLIBSzListOr() failed!! tavoerr=[0x0200]",
+         [&] { return TLIBFileGetKeys(file.c_str(), wanted, found, "="); });
+    logs(" TLIBSzHashEnumKey() failed!", [&] { return TLIBFileSetKeys(file.c_str(), pairs, nullptr); });
 }
 
 // A file system of 64 KiB of its own.

@@ -5,13 +5,8 @@
 #include "tavo_file.h"
 #include "tavo_section.h"
 
-#include "support/appliance_root.h"
 #include "support/owned_container.h"
-
-#include <filesystem>
-#include <set>
-#include <string>
-#include <vector>
+#include "support/test.h"
 
 namespace test {
 

@@ -1,13 +1,9 @@
 // tavoctl watch where the kernel is this machine's: mounts, links, addresses and services of a root of its own.
 #include "run_tavoctl.h"
-#include "support/appliance_root.h"
-#include "support/eventually.h"
 #include "support/machine.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 
 #include <nlohmann/json.hpp>
-
-#include <filesystem>
 
 namespace {
 
