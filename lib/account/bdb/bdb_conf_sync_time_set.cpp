@@ -12,7 +12,7 @@ extern "C" int TAVOBDbConfSyncTimeSet(TAVOBDB *pDb, int64_t time)
     if (!pDb)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        if (const int code = tavo::Btree::Of(pDb)->SetNumber(tavo::kSyncTimeKey, static_cast<int32_t>(time))) {
+        if (const tavo::Code code = tavo::Btree::Of(pDb)->SetNumber(tavo::kSyncTimeKey, static_cast<int32_t>(time))) {
             LogError("%s:%d Failed to store a key, errno=%d", errno);
             return Fail(code);
         }

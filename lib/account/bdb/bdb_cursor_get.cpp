@@ -20,7 +20,7 @@ extern "C" int TAVOBDbCursorGet(TAVOBDB *pDb, int fSkipReserved, void **ppKey, i
             return Fail(ERR_BAD_PARAMETERS);
         key = tavo::BytesOf(*ppKey, *pcbKey);
     }
-    if (const int code = tavo::Btree::Of(pDb)->Step(fSkipReserved == 1, key, value)) {
+    if (const tavo::Code code = tavo::Btree::Of(pDb)->Step(fSkipReserved == 1, key, value)) {
         if (code != ERR_DB_END)
             LogError("%s:%d Failed to read at the cursor, errno=%d", errno);
         return Fail(code);

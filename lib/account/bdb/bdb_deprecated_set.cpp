@@ -12,7 +12,7 @@ extern "C" int TAVOBDbDeprecatedSet(TAVOBDB *pDb, int32_t value)
     if (!pDb)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        if (const int code = tavo::Btree::Of(pDb)->SetNumber(tavo::kDeprecatedKey, value)) {
+        if (const tavo::Code code = tavo::Btree::Of(pDb)->SetNumber(tavo::kDeprecatedKey, value)) {
             LogError("%s:%d Failed to store a key, errno=%d", errno);
             return Fail(code);
         }

@@ -13,7 +13,7 @@ extern "C" int TAVOBDbDomainExpireTimeSet(TAVOBDB *pDb)
     if (!pDb)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        if (const int code =
+        if (const tavo::Code code =
                 tavo::Btree::Of(pDb)->SetNumber(tavo::kExpireKey, static_cast<int32_t>(std::time(nullptr)))) {
             LogError("%s:%d Failed to store a key, errno=%d", errno);
             return Fail(code);

@@ -12,16 +12,16 @@ extern "C" int TAVOBDbGet(TAVOBDB *pDb, const void *pKey, int cbKey, void **ppVa
 {
     if (!pDb || !pKey || cbKey <= 0 || !ppValue || !pcbValue)
         return Fail(ERR_BAD_PARAMETERS);
-    std::string_view value;
-    if (const int code = tavo::Btree::Of(pDb)->Get(tavo::BytesOf(pKey, cbKey), value)) {
-        if (code != ERR_KEY_NOT_FOUND)
+    const tavo::Result<std::string_view> value = tavo::Btree::Of(pDb)->Get(tavo::BytesOf(pKey, cbKey));
+    if (!value) {
+        if (value.Failure() != ERR_KEY_NOT_FOUND)
             LogError("%s:%d Failed to read a key, errno=%d", errno);
-        return Fail(code);
+        return Fail(value.Failure());
     }
-    tavo::HeapBlock<void> copy = tavo::CopyBytes(value);
+    tavo::HeapBlock<void> copy = tavo::CopyBytes(*value);
     if (!copy)
         return Fail(ERR_OUT_OF_MEMORY);
     *ppValue = copy.Release();
-    *pcbValue = static_cast<int>(value.size());
+    *pcbValue = static_cast<int>(value->size());
     return 0;
 }

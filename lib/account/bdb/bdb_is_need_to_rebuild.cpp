@@ -9,7 +9,7 @@ extern "C" int TAVOBDbIsNeedToRebuild(TAVOBDB *pDb, int64_t mtime)
     if (!pDb)
         return Fail(ERR_BAD_PARAMETERS);
     int32_t stored = 0;
-    if (const int code = tavo::Btree::Of(pDb)->GetNumber(tavo::kSyncTimeKey, stored))
+    if (const tavo::Code code = tavo::Btree::Of(pDb)->GetNumber(tavo::kSyncTimeKey, stored))
         return Fail(code);
     return stored == static_cast<int32_t>(mtime) ? 0 : 1;
 }

@@ -20,7 +20,7 @@ extern "C" TAVOBDB *TAVOBDbOpen(const char *szPath, int flags, int fBtreeInfo)
     return Guard([&]() -> TAVOBDB * {
         const tavo::Btree::Options options{flags, fBtreeInfo == 1, kModeOfOthers};
         std::unique_ptr<tavo::Btree> store;
-        if (const int code = tavo::Btree::Open(szPath, options, store)) {
+        if (const tavo::Code code = tavo::Btree::Open(szPath, options, store)) {
             LogError("%s:%d Failed to open %s, errno=%d", szPath, errno);
             return FailNull(code);
         }

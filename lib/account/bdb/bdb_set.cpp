@@ -13,7 +13,8 @@ extern "C" int TAVOBDbSet(TAVOBDB *pDb, const void *pKey, int cbKey, const void 
     if (!pDb || !pKey || cbKey <= 0 || !pValue || cbValue < 0)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        if (const int code = tavo::Btree::Of(pDb)->Set(tavo::BytesOf(pKey, cbKey), tavo::BytesOf(pValue, cbValue))) {
+        if (const tavo::Code code =
+                tavo::Btree::Of(pDb)->Set(tavo::BytesOf(pKey, cbKey), tavo::BytesOf(pValue, cbValue))) {
             LogError("%s:%d Failed to store a key, errno=%d", errno);
             return Fail(code);
         }

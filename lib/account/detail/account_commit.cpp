@@ -12,7 +12,7 @@
 namespace tavo {
 namespace {
 
-int WriteCode()
+Code WriteCode()
 {
     return errno == ENOSPC || errno == EDQUOT ? ERR_NOT_ENOUGH_SPACE : ERR_WRITE_FAILED;
 }
@@ -58,7 +58,7 @@ void AccountCommit::Complete()
     step.made = FileIdentity(step.temporary.c_str());
 }
 
-int AccountCommit::Write(const TextRow &row, std::string_view text, unsigned target)
+Code AccountCommit::Write(const TextRow &row, std::string_view text, unsigned target)
 {
     if (IsAlready(row.path, text))
         return 0;
@@ -84,7 +84,7 @@ void AccountCommit::Withdraw(unsigned target) noexcept
     });
 }
 
-int AccountCommit::WriteNeighbour(unsigned target, FileRewrite &file, std::string_view text, mode_t mode_of_new)
+Code AccountCommit::WriteNeighbour(unsigned target, FileRewrite &file, std::string_view text, mode_t mode_of_new)
 {
     const std::string &path = file.Target();
     Fd fd = Begin({target, path + ".tmp", path, {}, {}}, false);
@@ -96,7 +96,7 @@ int AccountCommit::WriteNeighbour(unsigned target, FileRewrite &file, std::strin
     return 0;
 }
 
-int AccountCommit::Commit()
+Code AccountCommit::Commit()
 {
     const bool follows = marker_.HasMoreThanFiles();
     if (!follows && marker_.files.empty())
@@ -107,7 +107,7 @@ int AccountCommit::Commit()
     return !follows && marker_.files.size() == 1 ? CommitOne() : CommitAll();
 }
 
-int AccountCommit::CommitOne()
+Code AccountCommit::CommitOne()
 {
     if (!MoveIntoPlace(marker_.files[0])) {
         if (marker_.files[0].target == kAccountFile)
@@ -137,11 +137,11 @@ bool AccountCommit::MoveAll(bool &moved)
 }
 
 // From the marker on nothing allocates memory: the change is completed at once, or the marker is removed again.
-int AccountCommit::CommitAll()
+Code AccountCommit::CommitAll()
 {
     const std::string text = FormatMarker(marker_);
     if (!WriteMarker(text, true) || !SyncFolders(marker_.files)) {
-        const int code = WriteCode();
+        const Code code = WriteCode();
         RemoveMarker();
         return code;
     }

@@ -11,6 +11,7 @@
 #include "account/detail/store_family.h"
 #include "core/detail/file_rewrite.h"
 #include "core/detail/owner.h"
+#include "core/detail/result.h"
 
 #include <string>
 #include <string_view>
@@ -28,10 +29,10 @@ class AccountCommit {
 
     // Writes the next generation of an account file, with the owner and mode of the old one. A `target` makes it a
     // neighbour's file: the group file when users change. 0, ERR_OPEN_FAILED, ERR_WRITE_FAILED or ERR_NOT_ENOUGH_SPACE.
-    int Write(const TextRow &row, std::string_view text, unsigned target = kAccountFile);
+    Code Write(const TextRow &row, std::string_view text, unsigned target = kAccountFile);
 
     // The same for a neighbour's file that `file` has opened and read. A failure leaves that file out of the commit.
-    int WriteNeighbour(unsigned target, FileRewrite &file, std::string_view text, mode_t mode_of_new);
+    Code WriteNeighbour(unsigned target, FileRewrite &file, std::string_view text, mode_t mode_of_new);
 
     // Leaves out the files of a target after all.
     void Withdraw(unsigned target) noexcept;
@@ -47,7 +48,7 @@ class AccountCommit {
     // All files must have been written. 0; ERR_WRITE_FAILED or ERR_NOT_ENOUGH_SPACE with nothing moved;
     // ERR_RENAME_FAILED with nothing moved, or with the rest left to ResumeCommit. Neighbours' files that could not be
     // moved are pending in the steps.
-    int Commit();
+    Code Commit();
 
     // Returns whether the last Commit also made its renames durable. They have taken place even if not.
     bool IsSynced() const { return synced_; }
@@ -59,8 +60,8 @@ class AccountCommit {
   private:
     Fd Begin(FileStep step, bool makes_folder);  // the temporary file of a step, which joins the list
     void Complete();                             // the last one is written
-    int CommitOne();
-    int CommitAll();
+    Code CommitOne();
+    Code CommitAll();
     bool MoveAll(bool &moved);
 
     Marker marker_;

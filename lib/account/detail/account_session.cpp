@@ -29,43 +29,43 @@ AccountSession::~AccountSession()
     Unlock();
 }
 
-int AccountSession::OpenToRead(std::span<const size_t> stores)
+Code AccountSession::OpenToRead(std::span<const size_t> stores)
 {
     if (!is_root_)
         return text_stores_.Open(stores);
     if (!LoadExtras())
         return ERR_OPEN_FAILED;
-    if (const int code = Lock(kind_.lock, TAVO_LOCK_SHARED))
+    if (const Code code = Lock(kind_.lock, TAVO_LOCK_SHARED))
         return code;
     if (SealHolds(kind_.family) && Open(stores) == 0 && IsCurrent())
         return 0;
     stores_.clear();
     Unlock();
-    if (const int code = Lock(kind_.lock, TAVO_LOCK_EXCLUSIVE))
+    if (const Code code = Lock(kind_.lock, TAVO_LOCK_EXCLUSIVE))
         return code;
-    const int code = OpenSettled(stores);
+    const Code code = OpenSettled(stores);
     system_.Release();
     return code;
 }
 
-int AccountSession::OpenToChange(unsigned locks)
+Code AccountSession::OpenToChange(unsigned locks)
 {
-    const int code = LockToChange(locks);
+    const Code code = LockToChange(locks);
     return code != 0 ? code : OpenAll();
 }
 
-int AccountSession::LockToChange(unsigned locks)
+Code AccountSession::LockToChange(unsigned locks)
 {
     if (!is_root_)
         return ERR_ACCESS_DENIED;
     if (!LoadExtras())
         return ERR_OPEN_FAILED;
-    if (const int code = Lock(locks, TAVO_LOCK_EXCLUSIVE))
+    if (const Code code = Lock(locks, TAVO_LOCK_EXCLUSIVE))
         return code;
-    return system_.Take(kLockSeconds) ? 0 : int{ERR_LOCK_FAILED};
+    return system_.Take(kLockSeconds) ? ERR_SUCCESS : ERR_LOCK_FAILED;
 }
 
-int AccountSession::OpenAll()
+Code AccountSession::OpenAll()
 {
     std::vector<size_t> all(kind_.family.stores.size());
     std::iota(all.begin(), all.end(), size_t{0});
@@ -73,7 +73,7 @@ int AccountSession::OpenAll()
 }
 
 // Under the system's lock, so that programs that take it do not change the text files meanwhile.
-int AccountSession::OpenSettled(std::span<const size_t> stores)
+Code AccountSession::OpenSettled(std::span<const size_t> stores)
 {
     if (!system_.Take(kLockSeconds))
         return ERR_LOCK_FAILED;
@@ -81,12 +81,12 @@ int AccountSession::OpenSettled(std::span<const size_t> stores)
     if (SealHolds(kind_.family) && Open(stores) == 0 && IsCurrent())
         return 0;
     stores_.clear();
-    if (const int code = BuildStores(kind_, texts_))
+    if (const Code code = BuildStores(kind_, texts_))
         return code;
     return Open(stores);
 }
 
-int AccountSession::Merge()
+Code AccountSession::Merge()
 {
     std::string now = StampTexts(kind_.family);
     if (now == texts_)
@@ -95,7 +95,7 @@ int AccountSession::Merge()
     if (!ReadContent(kind_, content))
         return ERR_READ_FAILED;
     for (size_t i = 0; i < stores_.size(); ++i)
-        if (const int code = stores_[i]->TakeOver(content.stores[i], ContentsOf(kind_, i)))
+        if (const Code code = stores_[i]->TakeOver(content.stores[i], ContentsOf(kind_, i)))
             return code;
     texts_ = std::move(now);
     return 0;
@@ -111,9 +111,9 @@ void AccountSession::BeginChange()
     BreakSeal(kind_.family);
 }
 
-int AccountSession::Seal(Texts texts)
+Code AccountSession::Seal(Texts texts)
 {
-    int code = 0;
+    Code code = 0;
     for (const std::unique_ptr<Btree> &store : stores_)
         if (store)
             if (const int failed = store->Close())
@@ -124,7 +124,7 @@ int AccountSession::Seal(Texts texts)
     return code;
 }
 
-int AccountSession::SealWritten()
+Code AccountSession::SealWritten()
 {
     std::vector<TAVOBDB *> stores;
     for (const std::unique_ptr<Btree> &store : stores_)
@@ -140,7 +140,7 @@ bool AccountSession::Unlock()
     return locks_ == 0 || ErrTLIBFileUnlock(std::exchange(locks_, 0)) == 0;
 }
 
-int AccountSession::Lock(unsigned locks, unsigned mode)
+Code AccountSession::Lock(unsigned locks, unsigned mode)
 {
     if (ErrTLIBFileLock(locks | mode | TAVO_LOCK_NONBLOCKING, kLockSeconds) != 0)
         return ERR_LOCK_FAILED;
@@ -148,13 +148,13 @@ int AccountSession::Lock(unsigned locks, unsigned mode)
     return 0;
 }
 
-int AccountSession::Open(std::span<const size_t> stores)
+Code AccountSession::Open(std::span<const size_t> stores)
 {
     stores_.clear();
     stores_.resize(kind_.family.stores.size());
     for (const size_t index : stores) {
         const char *path = kind_.family.stores[index].path;
-        if (const int code = Btree::Open(path, {O_RDWR, true, 0}, stores_[index]))
+        if (const Code code = Btree::Open(path, {O_RDWR, true, 0}, stores_[index]))
             return CodeOfStores(code);
     }
     return 0;

@@ -9,6 +9,7 @@
 #include "account/detail/store_build.h"
 #include "account/detail/system_lock.h"
 #include "account/detail/text_stores.h"
+#include "core/detail/result.h"
 
 #include <memory>
 #include <span>
@@ -32,12 +33,12 @@ class AccountSession {
     // Opens the stores of the family that `stores` lists, under the family's lock, shared. To rebuild them
     // it takes the lock exclusively, and keeps it. A program that is not root reads the text files instead, without any
     // lock. Returns 0, ERR_LOCK_FAILED, ERR_OPEN_FAILED, or a code of BuildStores or TextStores::Open.
-    int OpenToRead(std::span<const size_t> stores);
+    Code OpenToRead(std::span<const size_t> stores);
 
     // Takes `locks` and the system's lock exclusively and opens all stores. ERR_ACCESS_DENIED to all but root.
-    int OpenToChange(unsigned locks);
-    int LockToChange(unsigned locks);  // the two halves of it
-    int OpenAll();
+    Code OpenToChange(unsigned locks);
+    Code LockToChange(unsigned locks);  // the two halves of it
+    Code OpenAll();
 
     // To look things up in a store, and to change it.
     StoreView *View(size_t index) const { return is_root_ ? Store(index) : text_stores_.View(index); }
@@ -48,7 +49,7 @@ class AccountSession {
 
     // For accounts that this change does not touch the text files have precedence: takes over edits by other programs
     // since the stores were opened. Returns 0, ERR_READ_FAILED or a code of the stores.
-    int Merge();
+    Code Merge();
     bool IsMerged() const;  // no text file has changed since
 
     // The text files at the end of a change: written from the stores, or, when nothing changed, the old ones.
@@ -56,18 +57,18 @@ class AccountSession {
 
     // Closes the stores and seals them: they and the text files agree. ERR_DB_CLOSE when a store could not be written;
     // then it stays unsealed.
-    int Seal(Texts texts);
+    Code Seal(Texts texts);
 
     // The same with the times of the files that were written from the stores.
-    int SealWritten();
+    Code SealWritten();
 
     // Releases the locks; returns false when that failed. The destructor does the same.
     bool Unlock();
 
   private:
-    int Lock(unsigned locks, unsigned mode);
-    int Open(std::span<const size_t> stores);
-    int OpenSettled(std::span<const size_t> stores);
+    Code Lock(unsigned locks, unsigned mode);
+    Code Open(std::span<const size_t> stores);
+    Code OpenSettled(std::span<const size_t> stores);
     bool IsCurrent() const;
 
     const AccountKind &kind_;

@@ -13,12 +13,12 @@
 
 namespace tavo {
 
-int AccountTransaction::Begin(unsigned locks)
+Code AccountTransaction::Begin(unsigned locks)
 {
     for (;;) {
         // Everybody's files may have to be finished, and a lock that comes earlier cannot be taken later.
         const unsigned wanted = MarkerStands() ? locks | kAccountLocks : locks;
-        if (const int code = session_.LockToChange(wanted))
+        if (const Code code = session_.LockToChange(wanted))
             return code;
         if (wanted == (locks | kAccountLocks) || !MarkerStands())
             break;
@@ -26,7 +26,7 @@ int AccountTransaction::Begin(unsigned locks)
     }
     Marker earlier;
     if (MarkerStands()) {
-        if (const int code = ResumeCommit(earlier))
+        if (const Code code = ResumeCommit(earlier))
             return code;
     }
     // Temporary files of a process that died before its change was decided: they hold hashes.
@@ -74,11 +74,11 @@ bool AccountTransaction::IsPending(bool is_group, const std::string &key) const
            }));
 }
 
-int AccountTransaction::ComposeAccounts(const std::function<int()> &compose)
+Code AccountTransaction::ComposeAccounts(const std::function<int()> &compose)
 {
     constexpr int rounds = 5;
     for (int round = 0; round < rounds; ++round) {
-        int code = session_.Merge();
+        Code code = session_.Merge();
         if (code == 0)
             code = compose();
         if (code != 0 || session_.IsMerged())
@@ -88,10 +88,10 @@ int AccountTransaction::ComposeAccounts(const std::function<int()> &compose)
     return ERR_RENAME_FAILED;
 }
 
-int AccountTransaction::Commit()
+Code AccountTransaction::Commit()
 {
     const unsigned pending = neighbours_.Pending();
-    if (const int code = commit_.Commit())
+    if (const Code code = commit_.Commit())
         return code;
     committed_ = true;
     // The change has happened. Steps that fail from here on, also for lack of memory, are left to the next change.

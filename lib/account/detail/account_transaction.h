@@ -7,6 +7,7 @@
 #include "account/detail/account_session.h"
 #include "account/detail/home_changes.h"
 #include "account/detail/neighbour_changes.h"
+#include "core/detail/result.h"
 
 #include <functional>
 #include <string>
@@ -25,7 +26,7 @@ class AccountTransaction {
 
     // Takes the locks, all three of the accounts when something is left to do, does it, and opens the stores. The codes
     // of AccountSession::OpenToChange and ResumeCommit.
-    int Begin(unsigned locks);
+    Code Begin(unsigned locks);
 
     AccountSession &Session() { return session_; }
 
@@ -42,10 +43,10 @@ class AccountTransaction {
 
     // Composes the account files by `compose` from stores into which everything is merged that others have changed in
     // the files meanwhile. Its code; after some rounds ERR_RENAME_FAILED.
-    int ComposeAccounts(const std::function<int()> &compose);
+    Code ComposeAccounts(const std::function<int()> &compose);
 
     // Everything at once, then the home folders. A code of AccountCommit::Commit. From 0 on nothing fails any more.
-    int Commit();
+    Code Commit();
 
     // Releases the locks; then, after a commit, flushes the caches of the system's look-ups, and removes and copies folders.
     // Returns false when a lock could not be released.

@@ -31,7 +31,7 @@ std::string_view Bytes(const DBT &item)
 }
 
 // The code of a failed call, by errno; `other` where the system's reason has no code of its own.
-int CodeOf(int reason, int other)
+Code CodeOf(int reason, int other)
 {
     switch (reason) {
     case EIO:
@@ -69,25 +69,24 @@ unsigned SequenceFlag(int32_t cursor_type)
 Btree::~Btree()
 {
     KeepErrno keep;
-    CloseFile();
+    (void)CloseFile();
 }
 
-int Btree::Get(std::string_view key, std::string_view &value) const
+Result<std::string_view> Btree::Get(std::string_view key) const
 {
     const DBT wanted = Item(key);
     DBT found = {};
     const int result = Handle(this)->get(Handle(this), &wanted, &found, 0);
     if (result != 0)
-        return result > 0 ? ERR_KEY_NOT_FOUND : CodeOf(errno, ERR_DB_CURSOR);
-    value = Bytes(found);
-    return 0;
+        return result > 0 ? Code(ERR_KEY_NOT_FOUND) : CodeOf(errno, ERR_DB_CURSOR);
+    return Bytes(found);
 }
 
-int Btree::Set(std::string_view key, std::string_view value)
+Code Btree::Set(std::string_view key, std::string_view value)
 {
     if (!NoteChange())
         return ERR_DB_STORE;
-    if (const int code = Put(key, value))
+    if (const Code code = Put(key, value))
         return code;
     touched_.emplace(key);
     if (const auto gone = deleted_.find(key); gone != deleted_.end())
@@ -95,13 +94,13 @@ int Btree::Set(std::string_view key, std::string_view value)
     return 0;
 }
 
-int Btree::Damaged(int code)
+Code Btree::Damaged(int code)
 {
     damaged_ = true;
     return CodeOf(errno, code);
 }
 
-int Btree::Put(std::string_view key, std::string_view value)
+Code Btree::Put(std::string_view key, std::string_view value)
 {
     DBT name = Item(key);
     const DBT content = Item(value);
@@ -113,14 +112,14 @@ int Btree::Put(std::string_view key, std::string_view value)
     return 0;
 }
 
-int Btree::TakeOver(const std::map<std::string, std::string, std::less<>> &entries, StoreContents contents)
+Code Btree::TakeOver(const std::map<std::string, std::string, std::less<>> &entries, StoreContents contents)
 {
     if (!NoteChange())
         return ERR_DB_STORE;
     std::vector<std::string> gone;
     std::string_view key;
     std::string_view value;
-    int code;
+    Code code;
     for (Entry which = Entry::first; (code = Walk(which, key, value)) == 0; which = Entry::next)
         if (!entries.contains(key) && !touched_.contains(key) && !IsDomainEntry(key, value, contents))
             gone.emplace_back(key);
@@ -134,8 +133,9 @@ int Btree::TakeOver(const std::map<std::string, std::string, std::less<>> &entri
     for (const auto &[each, text] : entries) {
         if (touched_.contains(each))
             continue;
-        code = Get(each, value);
-        if (code == ERR_KEY_NOT_FOUND || (code == 0 && value != text))
+        const Result<std::string_view> stored = Get(each);
+        code = stored.Failure().Renaming(ERR_KEY_NOT_FOUND, ERR_SUCCESS);
+        if (code == 0 && (!stored || *stored != text))
             code = Put(each, text);
         if (code != 0)
             return code;
@@ -143,7 +143,7 @@ int Btree::TakeOver(const std::map<std::string, std::string, std::less<>> &entri
     return 0;
 }
 
-int Btree::Delete(std::string_view key)
+Code Btree::Delete(std::string_view key)
 {
     if (!NoteChange())
         return ERR_DB_DELETE;
@@ -156,7 +156,7 @@ int Btree::Delete(std::string_view key)
     return 0;
 }
 
-int Btree::Step(bool skip_reserved, std::string_view &key, std::string_view &value)
+Code Btree::Step(bool skip_reserved, std::string_view &key, std::string_view &value)
 {
     for (;;) {
         const unsigned flag = SequenceFlag(nCursorType);
@@ -177,44 +177,44 @@ int Btree::Step(bool skip_reserved, std::string_view &key, std::string_view &val
     }
 }
 
-int Btree::Walk(Entry which, std::string_view &key, std::string_view &value)
+Code Btree::Walk(Entry which, std::string_view &key, std::string_view &value)
 {
     nCursorType = which == Entry::first ? TAVO_BDB_CURSOR_FIRST : TAVO_BDB_CURSOR_NEXT;
     return Step(true, key, value);
 }
 
-int Btree::GetNumber(std::string_view key, int32_t &value) const
+Code Btree::GetNumber(std::string_view key, int32_t &value) const
 {
-    std::string_view bytes;
-    if (const int code = Get(key, bytes))
-        return code;
-    if (bytes.size() != sizeof value)
+    const Result<std::string_view> bytes = Get(key);
+    if (!bytes)
+        return bytes.Failure();
+    if (bytes->size() != sizeof value)
         return ERR_DB_CURSOR;
-    std::memcpy(&value, bytes.data(), sizeof value);
+    std::memcpy(&value, bytes->data(), sizeof value);
     return 0;
 }
 
-int Btree::SetNumber(std::string_view key, int32_t value)
+Code Btree::SetNumber(std::string_view key, int32_t value)
 {
     return Set(key, {reinterpret_cast<const char *>(&value), sizeof value});
 }
 
-int Btree::Flush()
+Code Btree::Flush()
 {
     const NoStoreSync no_sync;
-    return Handle(this)->sync(Handle(this), 0) == 0 ? 0 : Damaged(ERR_DB_STORE);
+    return Handle(this)->sync(Handle(this), 0) == 0 ? Code() : Damaged(ERR_DB_STORE);
 }
 
-int Btree::Close()
+Code Btree::Close()
 {
-    if (const int code = CloseFile())
+    if (const Code code = CloseFile())
         return code;
     if (std::exchange(sealed_, false) && !damaged_)
         WriteSeal(*FamilyOfStore(path_.c_str()), texts_);
     return 0;
 }
 
-int Btree::CloseFile() noexcept
+Code Btree::CloseFile() noexcept
 {
     if (!pDb)
         return 0;

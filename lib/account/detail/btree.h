@@ -7,6 +7,7 @@
 
 #include "account/detail/account_name.h"
 #include "account/detail/store_view.h"
+#include "core/detail/result.h"
 
 #include <map>
 #include <memory>
@@ -29,10 +30,10 @@ class Btree : public TAVOBDB, public StoreView {
     };
 
     // 0 and a handle, or an error code. A file that is not a store is gone after ERR_DB_OPEN.
-    static int Open(const char *path, const Options &options, std::unique_ptr<Btree> &out);
+    static Code Open(const char *path, const Options &options, std::unique_ptr<Btree> &out);
 
     // Creates a new store in a private folder. The file's mode is 0600.
-    static int Create(const char *path, std::unique_ptr<Btree> &out);
+    static Code Create(const char *path, std::unique_ptr<Btree> &out);
 
     // The store of a caller's handle: every TAVOBDB comes from Open.
     static Btree *Of(TAVOBDB *handle) { return static_cast<Btree *>(handle); }
@@ -40,25 +41,25 @@ class Btree : public TAVOBDB, public StoreView {
 
     ~Btree() override;  // without Close: something has failed, and a changed store is not sealed
 
-    // The views stay valid until the next call on this handle. Absent: ERR_KEY_NOT_FOUND.
-    int Get(std::string_view key, std::string_view &value) const override;
-    int Set(std::string_view key, std::string_view value);
-    int Delete(std::string_view key);
+    // The view stays valid until the next call on this handle. Absent: ERR_KEY_NOT_FOUND.
+    Result<std::string_view> Get(std::string_view key) const override;
+    Code Set(std::string_view key, std::string_view value);
+    Code Delete(std::string_view key);
 
     // One step as nCursorType says; past the end: ERR_DB_END. `key` is read for TAVO_BDB_CURSOR_KEY.
-    int Step(bool skip_reserved, std::string_view &key, std::string_view &value);
-    int Walk(Entry which, std::string_view &key, std::string_view &value) override;
+    Code Step(bool skip_reserved, std::string_view &key, std::string_view &value);
+    Code Walk(Entry which, std::string_view &key, std::string_view &value) override;
 
     // A 32-bit value of a reserved key. ERR_DB_CURSOR when it is there but not four bytes long.
-    int GetNumber(std::string_view key, int32_t &value) const;
-    int SetNumber(std::string_view key, int32_t value);
+    Code GetNumber(std::string_view key, int32_t &value) const;
+    Code SetNumber(std::string_view key, int32_t value);
 
     // Takes over what the text files say by now, except for the keys that were stored or deleted through this handle,
     // and for domain accounts, which the text files do not have.
-    int TakeOver(const std::map<std::string, std::string, std::less<>> &entries, StoreContents contents);
+    Code TakeOver(const std::map<std::string, std::string, std::less<>> &entries, StoreContents contents);
 
-    int Flush();  // hands all pages to the file
-    int Close();  // Flush and release; ERR_DB_CLOSE or ERR_OUT_OF_MEMORY
+    Code Flush();  // hands all pages to the file
+    Code Close();  // Flush and release; ERR_DB_CLOSE or ERR_OUT_OF_MEMORY
 
     // The keys that were deleted through this handle and not stored again.
     const std::set<std::string, std::less<>> &Deleted() const { return deleted_; }
@@ -68,10 +69,10 @@ class Btree : public TAVOBDB, public StoreView {
     {
     }
     bool NoteChange();  // false when nothing may be changed
-    int Put(std::string_view key, std::string_view value);
-    int Damaged(int code);
+    Code Put(std::string_view key, std::string_view value);
+    Code Damaged(int code);
 
-    int CloseFile() noexcept;
+    Code CloseFile() noexcept;
 
     std::string path_;
     std::set<std::string, std::less<>> deleted_;

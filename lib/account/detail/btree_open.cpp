@@ -16,7 +16,7 @@
 namespace tavo {
 namespace {
 
-int OpenCode(int reason)
+Code OpenCode(int reason)
 {
     switch (reason) {
     case ENOMEM:
@@ -37,7 +37,7 @@ int OpenCode(int reason)
 }
 
 // Removes a file that is not a store so that the next open can create one. Only root clears the names of the families.
-int RemoveForeign(const char *path, bool is_ours)
+Code RemoveForeign(const char *path, bool is_ours)
 {
     if (is_ours && ::geteuid() != 0)
         return ERR_ACCESS_DENIED;
@@ -59,7 +59,7 @@ bool IsSameFile(const Btree &store, const StoreFile &file)
 
 }  // namespace
 
-int Btree::Open(const char *path, const Options &options, std::unique_ptr<Btree> &out)
+Code Btree::Open(const char *path, const Options &options, std::unique_ptr<Btree> &out)
 {
     const Extras *extras = LoadExtras();
     if (!extras)
@@ -101,7 +101,7 @@ int Btree::Open(const char *path, const Options &options, std::unique_ptr<Btree>
     return 0;
 }
 
-int Btree::Create(const char *path, std::unique_ptr<Btree> &out)
+Code Btree::Create(const char *path, std::unique_ptr<Btree> &out)
 {
     const Extras *extras = LoadExtras();
     if (!extras)

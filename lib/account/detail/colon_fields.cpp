@@ -3,8 +3,9 @@
 
 #include "tavo_str.h"
 
+#include "core/detail/strict_number.h"
+
 #include <algorithm>
-#include <charconv>
 #include <climits>
 
 namespace tavo {
@@ -26,11 +27,10 @@ std::vector<std::string_view> SplitColons(std::string_view line)
 
 std::optional<int32_t> FieldNumber(std::string_view field)
 {
-    int64_t number = 0;
-    const auto [end, error] = std::from_chars(field.data(), field.data() + field.size(), number);
-    if (error != std::errc() || end != field.data() + field.size() || number < INT_MIN || number > UINT_MAX)
+    const auto number = StrictNumber<int64_t>(field);
+    if (!number || *number < INT_MIN || *number > UINT_MAX)
         return std::nullopt;
-    return static_cast<int32_t>(number);
+    return static_cast<int32_t>(*number);
 }
 
 bool FitsInField(std::string_view text, bool colon_ends_it)

@@ -5,6 +5,7 @@
 
 #include "account/detail/store_content.h"
 #include "core/detail/open_file.h"
+#include "core/detail/strict_number.h"
 #include "core/detail/text_fields.h"
 
 #include <algorithm>
@@ -57,29 +58,21 @@ std::string Decoded(std::string_view field)
     return text;
 }
 
-template <class Number>
-Number NumberOf(std::string_view field)
-{
-    Number number{};
-    std::from_chars(field.data(), field.data() + field.size(), number);
-    return number;
-}
-
 bool ParseStep(const std::vector<std::string_view> &fields, Marker &marker)
 {
     const std::string_view what = fields[0];
     if (what == "file" && fields.size() == 6)
-        marker.files.push_back({NumberOf<unsigned>(fields[1]), Decoded(fields[2]), Decoded(fields[3]),
+        marker.files.push_back({LeadingNumber<unsigned>(fields[1]), Decoded(fields[2]), Decoded(fields[3]),
                                 std::string(fields[4]), std::string(fields[5])});
     else if (what == "name" && fields.size() == 6)
-        marker.names.push_back({fields[1] == "group", NumberOf<unsigned>(fields[2]), NumberOf<unsigned>(fields[3]),
-                                Decoded(fields[4]), Decoded(fields[5])});
+        marker.names.push_back({fields[1] == "group", LeadingNumber<unsigned>(fields[2]),
+                                LeadingNumber<unsigned>(fields[3]), Decoded(fields[4]), Decoded(fields[5])});
     else if (what == "home" && fields.size() == 7)
         marker.homes.push_back({fields[1] == kKinds[HomeStep::kMake]   ? HomeStep::kMake
                                 : fields[1] == kKinds[HomeStep::kMove] ? HomeStep::kMove
                                                                        : HomeStep::kRemove,
-                                Decoded(fields[2]), Decoded(fields[3]), NumberOf<int32_t>(fields[4]),
-                                NumberOf<int32_t>(fields[5]), NumberOf<uint64_t>(fields[6])});
+                                Decoded(fields[2]), Decoded(fields[3]), LeadingNumber<int32_t>(fields[4]),
+                                LeadingNumber<int32_t>(fields[5]), LeadingNumber<uint64_t>(fields[6])});
     else if (what == "stage" && fields.size() == 2)
         marker.stages.push_back(Decoded(fields[1]));
     else
@@ -157,12 +150,12 @@ bool MarkerStands() noexcept
     return ::access(kCommitMarker, F_OK) == 0;
 }
 
-int ReadMarker(Marker &marker)
+Code ReadMarker(Marker &marker)
 {
     marker = {};
     struct stat st;
     if (::lstat(kCommitMarker, &st) != 0)
-        return errno == ENOENT ? 0 : int{ERR_READ_FAILED};
+        return errno == ENOENT ? ERR_SUCCESS : ERR_READ_FAILED;
     std::string text;
     int64_t ignored = 0;
     const bool is_ours = S_ISREG(st.st_mode) && st.st_uid == 0 && (st.st_mode & 022) == 0;

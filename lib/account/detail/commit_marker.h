@@ -13,6 +13,8 @@
 #ifndef TAVO_ACCOUNT_DETAIL_COMMIT_MARKER_H
 #define TAVO_ACCOUNT_DETAIL_COMMIT_MARKER_H
 
+#include "core/detail/result.h"
+
 #include <cstdint>
 #include <string>
 #include <string_view>
@@ -84,7 +86,7 @@ bool MarkerStands() noexcept;
 
 // 0, also when there is none or only one that was cut short: that change was not decided, and its marker is gone.
 // ERR_READ_FAILED.
-int ReadMarker(Marker &marker);
+Code ReadMarker(Marker &marker);
 
 // Replaces it; with `durable` it is on the disk afterwards. False with errno, the old one unchanged.
 bool WriteMarker(const std::string &text, bool durable) noexcept;

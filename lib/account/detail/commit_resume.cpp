@@ -13,7 +13,7 @@
 namespace tavo {
 namespace {
 
-int FinishAccountFiles(const Marker &marker)
+Code FinishAccountFiles(const Marker &marker)
 {
     for (const FileStep &file : marker.files)
         if (file.target == kAccountFile && IsWhole(file) && !MoveIntoPlace(file))
@@ -35,13 +35,13 @@ bool FinishNeighbour(const FileStep &file)
 
 }  // namespace
 
-int ResumeCommit(Marker &marker)
+Code ResumeCommit(Marker &marker)
 {
-    if (const int code = ReadMarker(marker))
+    if (const Code code = ReadMarker(marker))
         return code;
     if (marker.files.empty())
         return 0;
-    if (const int code = FinishAccountFiles(marker))
+    if (const Code code = FinishAccountFiles(marker))
         return code;
     for (const FileStep &file : marker.files)
         if (file.target != kAccountFile && !FinishNeighbour(file))
@@ -56,14 +56,14 @@ int ResumeCommit(Marker &marker)
     return 0;
 }
 
-int FinishAccountFiles()
+Code FinishAccountFiles()
 {
     if (!MarkerStands())
         return 0;
     Marker marker;
-    if (const int code = ReadMarker(marker))
+    if (const Code code = ReadMarker(marker))
         return code;
-    if (const int code = FinishAccountFiles(marker))
+    if (const Code code = FinishAccountFiles(marker))
         return code;
     SyncFolders(marker.files);
     const bool more = std::any_of(marker.files.begin(), marker.files.end(),
@@ -71,16 +71,16 @@ int FinishAccountFiles()
     if (!more && !marker.HasMoreThanFiles()) {
         RemoveMarker();
         for (const StoreFamily *family : {&kUserFamily, &kGroupFamily})
-            RemoveTemporaries(*family);
+            (void)RemoveTemporaries(*family);
     }
     return 0;
 }
 
-int RemoveTemporaries(const StoreFamily &family)
+Code RemoveTemporaries(const StoreFamily &family)
 {
     if (MarkerStands())
         return ERR_REMOVE_FAILED;
-    int code = 0;
+    Code code = 0;
     for (const TextRow &row : family.texts)
         if (::unlink(row.temporary) != 0 && errno != ENOENT)
             code = ERR_REMOVE_FAILED;

@@ -9,15 +9,15 @@
 namespace tavo {
 namespace {
 
-int ReadEntries(Btree &store, StoreContents contents, StoreEntries &entries)
+Code ReadEntries(Btree &store, StoreContents contents, StoreEntries &entries)
 {
     std::string_view key;
     std::string_view value;
-    int code;
+    Code code;
     for (Entry which = Entry::first; (code = store.Walk(which, key, value)) == 0; which = Entry::next)
         if (IsDomainEntry(key, value, contents))
             entries.emplace(key, value);
-    return code == ERR_DB_END ? 0 : code;
+    return code.Renaming(ERR_DB_END, ERR_SUCCESS);
 }
 
 }  // namespace

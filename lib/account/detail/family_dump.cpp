@@ -15,19 +15,19 @@ void RecordSyncTimes(const StoreFamily &family, std::span<TAVOBDB *const> stores
         struct stat st = {};
         ::lstat(family.stores[i].text, &st);
         if (stores[i])
-            Btree::Of(stores[i])->SetNumber(kSyncTimeKey, static_cast<int32_t>(st.st_mtime));
+            (void)Btree::Of(stores[i])->SetNumber(kSyncTimeKey, static_cast<int32_t>(st.st_mtime));
     }
 }
 
-int WriteFamily(const StoreFamily &family, std::span<TAVOBDB *const> stores, std::span<const std::string> texts,
-                AccountCommit &commit, unsigned target, const char *&not_opened)
+Code WriteFamily(const StoreFamily &family, std::span<TAVOBDB *const> stores, std::span<const std::string> texts,
+                 AccountCommit &commit, unsigned target, const char *&not_opened)
 {
     // A full /tmp must show before anything is decided.
     for (TAVOBDB *store : stores)
-        if (const int code = Btree::Of(store)->Flush())
+        if (const Code code = Btree::Of(store)->Flush())
             return code;
     for (size_t i = 0; i < texts.size(); ++i) {
-        const int code = commit.Write(family.texts[i], texts[i], target);
+        const Code code = commit.Write(family.texts[i], texts[i], target);
         if (code == ERR_OPEN_FAILED)
             not_opened = family.texts[i].temporary;
         if (code != 0)

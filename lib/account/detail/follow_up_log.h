@@ -3,6 +3,7 @@
 #define TAVO_ACCOUNT_DETAIL_FOLLOW_UP_LOG_H
 
 #include "account/detail/commit_marker.h"
+#include "core/detail/result.h"
 #include "core/detail/where.h"
 
 namespace tavo {
@@ -12,7 +13,7 @@ struct FollowUpFailure {
     const HomeStep *home = nullptr;  // which; nullptr: those of deleted users that were put aside
     bool is_group = false;
     bool is_removal = false;
-    int code = 0;
+    Code code = 0;
 };
 
 // At the place of the function that changes the accounts. Folders that could not be removed and a missing settings file

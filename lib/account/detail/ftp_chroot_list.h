@@ -3,6 +3,7 @@
 #define TAVO_ACCOUNT_DETAIL_FTP_CHROOT_LIST_H
 
 #include "account/detail/name_lines.h"
+#include "core/detail/result.h"
 
 namespace tavo {
 
@@ -13,7 +14,7 @@ class FtpChrootList {
     // Removes the old name, if listed, and appends the new one. Returns false when the list cannot be read.
     bool Rename(const std::string &old_name, const std::string &new_name);
 
-    int Compose(unsigned target, AccountCommit &commit) { return names_.Compose(target, 0644, commit); }
+    Code Compose(unsigned target, AccountCommit &commit) { return names_.Compose(target, 0644, commit); }
 
   private:
     NameLines names_{kFtpChroot};

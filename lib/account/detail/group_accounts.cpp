@@ -17,7 +17,7 @@ bool FitsInMembers(std::string_view name)
     return name.size() <= kLongestField && FitsInField(name, true) && name.find(',') == name.npos && !IsDotName(name);
 }
 
-int TakeMembers(const TAVOGROUP &group, GroupChange &change)
+Code TakeMembers(const TAVOGROUP &group, GroupChange &change)
 {
     for (char *const *member = group.rgszMember; member && *member; ++member) {
         if (!FitsInMembers(*member))
@@ -28,17 +28,17 @@ int TakeMembers(const TAVOGROUP &group, GroupChange &change)
     return 0;
 }
 
-int FindOld(const TAVOGROUPDB &db, const char *old_name, GroupChange &change)
+Code FindOld(const TAVOGROUPDB &db, const char *old_name, GroupChange &change)
 {
     const std::optional<std::string> key = AccountKey(old_name, kGroupKeySize);
     if (!key || IsDomainName(old_name))  // a domain's group lives there
         return ERR_NO_SUCH_GROUP;
-    GroupLine old;
-    if (const int code = ReadGroupLine(db, *key, old))
-        return code;
+    const Result<GroupLine> old = ReadGroupLine(db, *key);
+    if (!old)
+        return old.Failure();
     change.old_key = *key;
-    change.old_name = old.name;
-    change.old_gid = old.gid;
+    change.old_name = old->name;
+    change.old_gid = old->gid;
     return 0;
 }
 
@@ -49,28 +49,24 @@ TAVOGROUPDB GroupDb(const AccountSession &session)
     return {session.Store(kGroupNameStore), session.Store(kGidStore), session.Store(kDescStore)};
 }
 
-int ReadGroupLine(const StoreView &names, std::string_view key, GroupLine &line)
+Result<GroupLine> ReadGroupLine(const StoreView &names, std::string_view key)
 {
-    std::string_view value;
-    const int code = names.Get(key, value);
-    if (code != 0)
-        return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_GROUP} : code;
-    return ParseGroupLine(value, line);
+    return ReadLine(names, key, ParseGroupLine).Renaming(ERR_KEY_NOT_FOUND, ERR_NO_SUCH_GROUP);
 }
 
-int ReadGroupLine(const TAVOGROUPDB &db, std::string_view key, GroupLine &line)
+Result<GroupLine> ReadGroupLine(const TAVOGROUPDB &db, std::string_view key)
 {
-    return ReadGroupLine(*Btree::Of(db.pName), key, line);
+    return ReadGroupLine(*Btree::Of(db.pName), key);
 }
 
-int FindGroupKey(const AccountSession &session, int32_t gid, std::string &key)
+Result<std::string> FindGroupKey(const AccountSession &session, int32_t gid)
 {
     const auto has_id = [](std::string_view text, int32_t id) {
-        GroupLine line;
-        return ParseGroupLine(text, line) == 0 && line.gid == id;
+        const Result<GroupLine> line = ParseGroupLine(text);
+        return line && line->gid == id;
     };
-    const int code = FindKeyById(*session.View(kGidStore), *session.View(kGroupNameStore), gid, has_id, key);
-    return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_GROUP} : code;
+    return FindKeyById(*session.View(kGidStore), *session.View(kGroupNameStore), gid, has_id)
+        .Renaming(ERR_KEY_NOT_FOUND, ERR_NO_SUCH_GROUP);
 }
 
 bool IsGroupDescription(std::string_view text)
@@ -78,7 +74,7 @@ bool IsGroupDescription(std::string_view text)
     return text.size() <= kLongestField && FitsInField(text, true);
 }
 
-int PrepareGroup(const TAVOGROUPDB &db, const char *old_name, const TAVOGROUP &group, int32_t gid, GroupChange &change)
+Code PrepareGroup(const TAVOGROUPDB &db, const char *old_name, const TAVOGROUP &group, int32_t gid, GroupChange &change)
 {
     change = {};
     const std::optional<std::string> key = AccountKey(group.szName, kGroupKeySize);
@@ -86,10 +82,10 @@ int PrepareGroup(const TAVOGROUPDB &db, const char *old_name, const TAVOGROUP &g
         return ERR_INVALID_GROUPNAME;
     change.key = *key;
     if (old_name)
-        if (const int code = FindOld(db, old_name, change))
+        if (const Code code = FindOld(db, old_name, change))
             return code;
     if (change.old_key != change.key)
-        if (const int code = RequireAbsent(*Btree::Of(db.pName), change.key, ERR_GROUP_EXISTS))
+        if (const Code code = RequireAbsent(*Btree::Of(db.pName), change.key, ERR_GROUP_EXISTS))
             return code;
     if (!IsAccountName(group.szName, kGroupNameChars) || IsDotName(group.szName))
         return ERR_INVALID_GROUPNAME;
@@ -100,43 +96,41 @@ int PrepareGroup(const TAVOGROUPDB &db, const char *old_name, const TAVOGROUP &g
     return TakeMembers(group, change);
 }
 
-int StoreGroup(const TAVOGROUPDB &db, const GroupChange &change)
+Code StoreGroup(const TAVOGROUPDB &db, const GroupChange &change)
 {
     std::string description;
     if (!change.old_key.empty()) {
-        std::string_view line;
-        int code = Btree::Of(db.pDesc)->Get(change.old_key, line);
-        if (code == 0)
-            description = GroupDescription(line);
-        else if (code != ERR_KEY_NOT_FOUND)
-            return code;
+        const Result<std::string_view> line = Btree::Of(db.pDesc)->Get(change.old_key);
+        if (line)
+            description = GroupDescription(*line);
+        else if (line.Failure() != ERR_KEY_NOT_FOUND)
+            return line.Failure();
         // The entries of a group that keeps its key are overwritten anyway.
         const bool overwritten = change.old_key == change.key && !IsEverybody(change.key);
-        code = RemoveGroup(db, change.old_key, change.old_gid);
+        const Code code = RemoveGroup(db, change.old_key, change.old_gid);
         if (code != 0 && !overwritten)
             return code;
     }
-    int code = Btree::Of(db.pName)->Set(change.key, WithNul(FormatGroupLine(change.line)));
+    Code code = Btree::Of(db.pName)->Set(change.key, WithNul(FormatGroupLine(change.line)));
     // Of two groups with one id the first keeps the index.
     if (code == 0)
         code = RequireAbsent(*Btree::Of(db.pGid), IdKey(change.line.gid), ERR_KEY_EXISTS);
     if (code == 0)
         code = Btree::Of(db.pGid)->Set(IdKey(change.line.gid), change.key);
-    if (code == ERR_KEY_EXISTS)
-        code = 0;
+    code = code.Renaming(ERR_KEY_EXISTS, ERR_SUCCESS);
     if (code == 0 && !description.empty())
         code = Btree::Of(db.pDesc)->Set(change.key, WithNul(FormatGroupDescLine(change.line.name, description)));
     return code;
 }
 
-int RemoveGroup(const TAVOGROUPDB &db, const std::string &key, int32_t gid)
+Code RemoveGroup(const TAVOGROUPDB &db, const std::string &key, int32_t gid)
 {
     const bool indexed = HasIndex(*Btree::Of(db.pGid), gid, key);
-    const int codes[] = {Btree::Of(db.pName)->Delete(key), Btree::Of(db.pDesc)->Delete(key),
-                         indexed ? Btree::Of(db.pGid)->Delete(IdKey(gid)) : 0};
-    for (const int code : codes)
+    const Code codes[] = {Btree::Of(db.pName)->Delete(key), Btree::Of(db.pDesc)->Delete(key),
+                          indexed ? Btree::Of(db.pGid)->Delete(IdKey(gid)) : Code()};
+    for (const Code code : codes)
         if (code != 0 && code != ERR_KEY_NOT_FOUND)
-            return code == ERR_OUT_OF_MEMORY ? code : int{ERR_GROUP_DB_DELETE};
+            return code == ERR_OUT_OF_MEMORY ? code : Code(ERR_GROUP_DB_DELETE);
     return 0;
 }
 

@@ -6,6 +6,7 @@
 
 #include "account/detail/group_line.h"
 #include "account/detail/id_index.h"
+#include "core/detail/result.h"
 
 namespace tavo {
 
@@ -17,11 +18,11 @@ inline constexpr IdRange kGids{kCurrentGidKey, TAVO_GROUP_GID_MIN, TAVO_GROUP_GI
 TAVOGROUPDB GroupDb(const AccountSession &session);
 
 // ERR_NO_SUCH_GROUP; ERR_FORMAT_ERROR, ERR_INVALID_GROUPNAME, ERR_DB_CURSOR ...
-int ReadGroupLine(const StoreView &names, std::string_view key, GroupLine &line);
-int ReadGroupLine(const TAVOGROUPDB &db, std::string_view key, GroupLine &line);
+Result<GroupLine> ReadGroupLine(const StoreView &names, std::string_view key);
+Result<GroupLine> ReadGroupLine(const TAVOGROUPDB &db, std::string_view key);
 
 // The key of the group with this id: ERR_NO_SUCH_GROUP when there is none.
-int FindGroupKey(const AccountSession &session, int32_t gid, std::string &key);
+Result<std::string> FindGroupKey(const AccountSession &session, int32_t gid);
 
 // A description that fits into its line. "" takes the description away.
 bool IsGroupDescription(std::string_view text);
@@ -36,13 +37,14 @@ struct GroupChange {
 };
 
 // Refuses with one of the codes of TAVOGroupDBSet; changes nothing. `gid` -1 keeps that of the old group.
-int PrepareGroup(const TAVOGROUPDB &db, const char *old_name, const TAVOGROUP &group, int32_t gid, GroupChange &change);
+Code PrepareGroup(const TAVOGROUPDB &db, const char *old_name, const TAVOGROUP &group, int32_t gid,
+                  GroupChange &change);
 
 // Fails only when a store cannot be changed; then the stores are no longer to be trusted.
-int StoreGroup(const TAVOGROUPDB &db, const GroupChange &change);
+Code StoreGroup(const TAVOGROUPDB &db, const GroupChange &change);
 
 // ERR_GROUP_DB_DELETE or ERR_OUT_OF_MEMORY when a store cannot be changed. Missing entries are skipped.
-int RemoveGroup(const TAVOGROUPDB &db, const std::string &key, int32_t gid);
+Code RemoveGroup(const TAVOGROUPDB &db, const std::string &key, int32_t gid);
 
 }  // namespace tavo
 

@@ -14,53 +14,49 @@
 namespace tavo {
 namespace {
 
-int ParseGroup(std::string_view text, std::string &name, int32_t &id)
+Result<NameAndId> ParseGroup(std::string_view text)
 {
-    GroupLine line;
-    const int code = ParseGroupLine(text, line);
-    if (code == 0) {
-        name = std::move(line.name);
-        id = line.gid;
-    }
-    return code;
+    Result<GroupLine> line = ParseGroupLine(text);
+    if (!line)
+        return line.Failure();
+    return NameAndId{std::move(line->name), line->gid};
 }
 
 constexpr AccountLines kGroupLines{ParseGroup, kGroupTextRows[kGroupText].path, kGroupKeySize};
 
-int ComposeFiles(const TAVOGROUPDB &db, GroupDumpReport &report, std::string (&texts)[kGroupTexts])
+Code ComposeFiles(const TAVOGROUPDB &db, GroupDumpReport &report, std::string (&texts)[kGroupTexts])
 {
     AccountKeys keys;
     std::vector<IndexedAccount> groups;
-    if (const int code = CollectAccounts(*Btree::Of(db.pGid), *Btree::Of(db.pName), kGroupLines, keys, groups))
+    if (const Code code = CollectAccounts(*Btree::Of(db.pGid), *Btree::Of(db.pName), kGroupLines, keys, groups))
         return code;
     report.groups = ReviewFile(*Btree::Of(db.pName), kGroupLines, keys);
     if (!report.groups.lost.empty())
         return ERR_WRITE_FAILED;
     int32_t last_gid = TAVO_GROUP_GID_MIN - 1;
-    if (const int code = ReadLastId(*Btree::Of(db.pGid), kCurrentGidKey, last_gid))
+    if (const Code code = ReadLastId(*Btree::Of(db.pGid), kCurrentGidKey, last_gid))
         return code;
     texts[kGroupText] = FormatMarkerLine(kGidMarker, last_gid);
     for (const IndexedAccount &group : groups) {
         texts[kGroupText].append(group.line) += '\n';
-        std::string_view description;
-        const int code = Btree::Of(db.pDesc)->Get(group.key, description);
-        if (code == ERR_KEY_NOT_FOUND)
+        const Result<std::string_view> description = Btree::Of(db.pDesc)->Get(group.key);
+        if (description.Failure() == ERR_KEY_NOT_FOUND)
             continue;
-        if (code != 0)
-            return code;
-        if (!IsOneLine(LineOf(description)))
+        if (!description)
+            return description.Failure();
+        if (!IsOneLine(LineOf(*description)))
             return ERR_FORMAT_ERROR;
-        texts[kDescText].append(LineOf(description)) += '\n';
+        texts[kDescText].append(LineOf(*description)) += '\n';
     }
     return 0;
 }
 
 }  // namespace
 
-int ComposeGroups(const TAVOGROUPDB &db, AccountCommit &commit, unsigned target, GroupDumpReport &report)
+Code ComposeGroups(const TAVOGROUPDB &db, AccountCommit &commit, unsigned target, GroupDumpReport &report)
 {
     std::string texts[kGroupTexts];
-    if (const int code = ComposeFiles(db, report, texts))
+    if (const Code code = ComposeFiles(db, report, texts))
         return code;
     TAVOBDB *const stores[] = {db.pName, db.pGid, db.pDesc};
     return WriteFamily(kGroupFamily, stores, texts, commit, target, report.not_opened);
@@ -76,7 +72,7 @@ int CommitGroups(AccountTransaction &change, Where where)
 {
     GroupDumpReport report;
     change.Compose();
-    int code = change.ComposeAccounts([&] {
+    Code code = change.ComposeAccounts([&] {
         report = {};
         return ComposeGroups(GroupDb(change.Session()), change.Files(), kAccountFile, report);
     });

@@ -6,6 +6,7 @@
 
 #include "account/detail/account_commit.h"
 #include "account/detail/indexed_accounts.h"
+#include "core/detail/result.h"
 #include "core/detail/where.h"
 
 #include <string>
@@ -22,7 +23,7 @@ struct GroupDumpReport {
 
 // Adds the files to a commit. 0, ERR_OPEN_FAILED, ERR_WRITE_FAILED, ERR_NOT_ENOUGH_SPACE, ERR_FORMAT_ERROR (a store holds a
 // line that is no group), or a code of the stores.
-int ComposeGroups(const TAVOGROUPDB &db, AccountCommit &commit, unsigned target, GroupDumpReport &report);
+Code ComposeGroups(const TAVOGROUPDB &db, AccountCommit &commit, unsigned target, GroupDumpReport &report);
 
 // Logs the lines that are not written again because they are not groups.
 void LogDroppedGroups(const GroupDumpReport &report, Where where);

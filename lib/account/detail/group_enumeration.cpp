@@ -24,26 +24,26 @@ bool IsListed(const GroupLine &group, int flags)
 
 }  // namespace
 
-int ListGroups(int flags, const KeyFilter &wanted, std::vector<std::string> &names)
+Code ListGroups(int flags, const KeyFilter &wanted, std::vector<std::string> &names)
 {
     if ((flags & (TAVO_GROUP_LOCAL | TAVO_GROUP_DOMAIN)) == 0)
         return ERR_BAD_PARAMETERS;
     AccountSession session(kGroupKind);
-    if (const int code = session.OpenToRead(std::array{size_t{kGroupNameStore}}))
+    if (const Code code = session.OpenToRead(std::array{size_t{kGroupNameStore}}))
         return code;
     StoreView &groups = *session.View(kGroupNameStore);
     std::string_view key;
     std::string_view value;
-    int code;
+    Code code;
     for (Entry which = Entry::first; (code = groups.Walk(which, key, value)) == 0; which = Entry::next) {
-        GroupLine group;
-        if (ParseGroupLine(value, group) != 0)
+        const Result<GroupLine> group = ParseGroupLine(value);
+        if (!group)
             continue;
-        const int kind = IsDomainName(group.name) ? TAVO_GROUP_DOMAIN : TAVO_GROUP_LOCAL;
-        if ((flags & kind) != 0 && IsListed(group, flags) && wanted(key.substr(0, key.find('\0'))))
-            names.push_back(group.name);
+        const int kind = IsDomainName(group->name) ? TAVO_GROUP_DOMAIN : TAVO_GROUP_LOCAL;
+        if ((flags & kind) != 0 && IsListed(*group, flags) && wanted(key.substr(0, key.find('\0'))))
+            names.push_back(group->name);
     }
-    return code == ERR_DB_END ? 0 : code == ERR_OUT_OF_MEMORY ? code : int{ERR_ENUM_FAILED};
+    return code == ERR_DB_END ? Code() : code == ERR_OUT_OF_MEMORY ? code : Code(ERR_ENUM_FAILED);
 }
 
 std::optional<std::string> GroupFilterText(const char *text)

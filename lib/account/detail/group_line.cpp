@@ -8,7 +8,7 @@
 
 namespace tavo {
 
-int ParseGroupLine(std::string_view text, GroupLine &line)
+Result<GroupLine> ParseGroupLine(std::string_view text)
 {
     const std::vector<std::string_view> fields = SplitColons(text);
     if (fields.size() != 4)
@@ -18,12 +18,12 @@ int ParseGroupLine(std::string_view text, GroupLine &line)
     const std::optional<int32_t> gid = FieldNumber(fields[2]);
     if (!gid)
         return ERR_FORMAT_ERROR;
-    line = {std::string(fields[0]), *gid, {}};
+    GroupLine line{std::string(fields[0]), *gid, {}};
     for (std::string_view rest = fields[3]; !rest.empty();) {
         if (const std::string_view member = TakeUntil(rest, ','); IsMember(member))
             line.members.emplace_back(member);
     }
-    return 0;
+    return line;
 }
 
 std::string FormatGroupLine(const GroupLine &line)

@@ -2,6 +2,8 @@
 #ifndef TAVO_ACCOUNT_DETAIL_GROUP_LINE_H
 #define TAVO_ACCOUNT_DETAIL_GROUP_LINE_H
 
+#include "core/detail/result.h"
+
 #include <cstdint>
 #include <string>
 #include <string_view>
@@ -15,9 +17,9 @@ struct GroupLine {
     std::vector<std::string> members;
 };
 
-// 0, ERR_FORMAT_ERROR when there are not four fields with a number, ERR_INVALID_GROUPNAME when the name is empty.
+// ERR_FORMAT_ERROR when there are not four fields with a number, ERR_INVALID_GROUPNAME when the name is empty.
 // Members that are no members of anything are left out: see IsMember.
-int ParseGroupLine(std::string_view text, GroupLine &line);
+Result<GroupLine> ParseGroupLine(std::string_view text);
 
 std::string FormatGroupLine(const GroupLine &line);
 

@@ -30,33 +30,33 @@ bool ChangeMembersOf(const MemberChange &change, GroupLine &group)
 }
 
 // The lines that are to be stored: a store is not changed while it is walked. Past the last group: 0.
-int Collect(StoreView &groups, const MemberChange &change, std::vector<std::pair<std::string, std::string>> &lines)
+Code Collect(StoreView &groups, const MemberChange &change, std::vector<std::pair<std::string, std::string>> &lines)
 {
     std::string_view key;
     std::string_view value;
-    int code;
+    Code code;
     for (Entry which = Entry::first; (code = groups.Walk(which, key, value)) == 0; which = Entry::next) {
-        GroupLine group;
-        if (ParseGroupLine(value, group) == 0 && ChangeMembersOf(change, group))
-            lines.emplace_back(key, FormatGroupLine(group).append(1, '\0'));
+        Result<GroupLine> group = ParseGroupLine(value);
+        if (group && ChangeMembersOf(change, *group))
+            lines.emplace_back(key, FormatGroupLine(*group).append(1, '\0'));
     }
-    return code == ERR_DB_END ? 0 : code;
+    return code.Renaming(ERR_DB_END, ERR_SUCCESS);
 }
 
 }  // namespace
 
-int ChangeMembers(AccountSession &session, const MemberChange &change, bool &changed)
+Code ChangeMembers(AccountSession &session, const MemberChange &change, bool &changed)
 {
     std::vector<std::pair<std::string, std::string>> lines;
     changed = false;
-    if (const int code = Collect(*session.View(kGroupNameStore), change, lines))
+    if (const Code code = Collect(*session.View(kGroupNameStore), change, lines))
         return code;
     if (lines.empty())
         return 0;
     changed = true;
     session.BeginChange();
     for (const auto &[key, line] : lines)
-        if (const int code = session.Store(kGroupNameStore)->Set(key, line))
+        if (const Code code = session.Store(kGroupNameStore)->Set(key, line))
             return code;
     return 0;
 }

@@ -3,6 +3,7 @@
 #define TAVO_ACCOUNT_DETAIL_GROUP_MEMBERS_H
 
 #include "account/detail/account_session.h"
+#include "core/detail/result.h"
 
 #include <functional>
 #include <string>
@@ -15,7 +16,7 @@ using MemberChange = std::function<const char *(const std::string &member)>;
 
 // Changes the open group stores; the seal is broken before the first change. 0 or a code of the stores; `changed` tells
 // whether any group has been stored.
-int ChangeMembers(AccountSession &session, const MemberChange &change, bool &changed);
+Code ChangeMembers(AccountSession &session, const MemberChange &change, bool &changed);
 
 }  // namespace tavo
 

@@ -39,9 +39,10 @@ class GroupEntries {
 
 void GroupEntries::AddGroup(std::string_view line)
 {
-    GroupLine group;
-    if (line.find('\0') != line.npos || ParseGroupLine(line, group) != 0 || IsDomainName(group.name))
+    const Result<GroupLine> parsed = ParseGroupLine(line);
+    if (line.find('\0') != line.npos || !parsed || IsDomainName(parsed->name))
         return;
+    const GroupLine &group = *parsed;
     const std::optional<std::string> key = FreeKey(stores_[kGroupNameStore], group.name, kGroupKeySize);
     if (!key)
         return;

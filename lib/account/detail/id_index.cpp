@@ -9,17 +9,17 @@ namespace tavo {
 namespace {
 
 // The id in the greatest key: without the reserved key, the next id follows it.
-int LastId(Btree &index, int32_t &id)
+Code LastId(Btree &index, int32_t &id)
 {
     std::string_view key;
     std::string_view value;
     index.nCursorType = TAVO_BDB_CURSOR_LAST;
-    const int code = index.Step(true, key, value);
+    const Code code = index.Step(true, key, value);
     if (code == ERR_DB_END)
         id = 0;
     else if (code == 0)
         id = FieldNumber(key.substr(0, key.find('\0'))).value_or(0);
-    return code == ERR_DB_END ? 0 : code;
+    return code.Renaming(ERR_DB_END, ERR_SUCCESS);
 }
 
 }  // namespace
@@ -33,51 +33,49 @@ std::string IdKey(int32_t id)
 
 bool HasIndex(Btree &index, int32_t id, std::string_view key)
 {
-    std::string_view owner;
-    return index.Get(IdKey(id), owner) == 0 && owner == key;
+    const Result<std::string_view> owner = index.Get(IdKey(id));
+    return owner && *owner == key;
 }
 
-int FindKeyById(const StoreView &index, StoreView &names, int32_t id, bool (*has_id)(std::string_view line, int32_t id),
-                std::string &key)
+Result<std::string> FindKeyById(const StoreView &index, StoreView &names, int32_t id,
+                                bool (*has_id)(std::string_view line, int32_t id))
 {
-    std::string_view owner;
-    std::string_view line;
-    int code = index.Get(IdKey(id), owner);
-    if (code == 0)
-        code = names.Get(owner, line);
-    if (code == 0 && has_id(line, id)) {
-        key = owner;
-        return 0;
+    const Result<std::string_view> indexed = index.Get(IdKey(id));
+    Code code = indexed.Failure();
+    if (indexed) {
+        const Result<std::string_view> account = names.Get(*indexed);
+        if (account && has_id(*account, id))
+            return std::string(*indexed);
+        code = account.Failure();
     }
     if (code != 0 && code != ERR_KEY_NOT_FOUND)
         return code;
-    for (Entry which = Entry::first; (code = names.Walk(which, owner, line)) == 0; which = Entry::next) {
-        if (has_id(line, id)) {
-            key = owner;
-            return 0;
-        }
-    }
-    return code == ERR_DB_END ? int{ERR_KEY_NOT_FOUND} : code;
+    std::string_view owner;
+    std::string_view line;
+    for (Entry which = Entry::first; (code = names.Walk(which, owner, line)) == 0; which = Entry::next)
+        if (has_id(line, id))
+            return std::string(owner);
+    return code.Renaming(ERR_DB_END, ERR_KEY_NOT_FOUND);
 }
 
-int ReadLastId(const Btree &index, std::string_view current_key, int32_t &id)
+Code ReadLastId(const Btree &index, std::string_view current_key, int32_t &id)
 {
     int32_t last = 0;
-    const int code = index.GetNumber(current_key, last);
+    const Code code = index.GetNumber(current_key, last);
     if (code == 0)
         id = last;
     // One of another size is as good as none.
-    return code == ERR_KEY_NOT_FOUND || code == ERR_DB_CURSOR ? 0 : code;
+    return code.Renaming(ERR_KEY_NOT_FOUND, ERR_SUCCESS).Renaming(ERR_DB_CURSOR, ERR_SUCCESS);
 }
 
-int FindFreeId(Btree &index, const IdRange &range, int32_t &id)
+Code FindFreeId(Btree &index, const IdRange &range, int32_t &id)
 {
     int32_t current = 0;
-    int code = index.GetNumber(range.current_key, current);
+    Code code = index.GetNumber(range.current_key, current);
     if (code == ERR_KEY_NOT_FOUND)
         code = LastId(index, current);
     if (code != 0)
-        return code == ERR_OUT_OF_MEMORY ? code : int{ERR_DB_CURSOR};
+        return code == ERR_OUT_OF_MEMORY ? code : Code(ERR_DB_CURSOR);
     const int32_t begin = current < range.first || current >= range.last ? range.first : current + 1;
     int32_t candidate = begin;
     do {

@@ -12,16 +12,15 @@ namespace {
 
 constexpr size_t kLongestBeginning = 64;
 
-int AddAccount(std::string_view key, std::string_view value, const AccountLines &lines, AccountKeys &seen,
-               std::vector<IndexedAccount> &accounts)
+Code AddAccount(std::string_view key, std::string_view value, const AccountLines &lines, AccountKeys &seen,
+                std::vector<IndexedAccount> &accounts)
 {
-    std::string name;
-    int32_t id = -1;
     const std::string_view text = LineOf(value);
-    if (!IsOneLine(text) || lines.parse(text, name, id) != 0)
+    const Result<NameAndId> account = lines.parse(text);
+    if (!IsOneLine(text) || !account)
         return ERR_FORMAT_ERROR;
-    if (seen.emplace(key).second && !IsDomainName(name))
-        accounts.push_back({std::string(key), name, static_cast<uint32_t>(id), std::string(text)});
+    if (seen.emplace(key).second && !IsDomainName(account->name))
+        accounts.push_back({std::string(key), account->name, static_cast<uint32_t>(account->id), std::string(text)});
     return 0;
 }
 
@@ -38,28 +37,26 @@ bool IsOneLine(std::string_view line)
 }
 
 // By the index first and then those that it does not name: accounts that share an id with another one.
-int CollectAccounts(Btree &index, Btree &names, const AccountLines &lines, AccountKeys &keys,
-                    std::vector<IndexedAccount> &accounts)
+Code CollectAccounts(Btree &index, Btree &names, const AccountLines &lines, AccountKeys &keys,
+                     std::vector<IndexedAccount> &accounts)
 {
     std::string_view key;
     std::string_view value;
-    int code;
+    Code code;
     for (Entry which = Entry::first; (code = index.Walk(which, key, value)) == 0; which = Entry::next) {
-        std::string_view line;
-        code = names.Get(value, line);
-        if (code == 0)
-            code = AddAccount(value, line, lines, keys, accounts);
+        const Result<std::string_view> line = names.Get(value);
+        code = line ? AddAccount(value, *line, lines, keys, accounts) : line.Failure();
         if (code != 0 && code != ERR_KEY_NOT_FOUND)
             return code;
     }
     if (code != ERR_DB_END)
         return code;
     for (Entry which = Entry::first; (code = names.Walk(which, key, value)) == 0; which = Entry::next)
-        if ((code = AddAccount(key, value, lines, keys, accounts)) != 0)
-            return code;
+        if (const Code added = AddAccount(key, value, lines, keys, accounts))
+            return added;
     std::stable_sort(accounts.begin(), accounts.end(),
                      [](const IndexedAccount &left, const IndexedAccount &right) { return left.id < right.id; });
-    return code == ERR_DB_END ? 0 : code;
+    return code.Renaming(ERR_DB_END, ERR_SUCCESS);
 }
 
 FileReview ReviewFile(const Btree &names, const AccountLines &lines, const AccountKeys &kept)
@@ -73,22 +70,20 @@ FileReview ReviewFile(const Btree &names, const AccountLines &lines, const Accou
     }
     std::set<std::string, std::less<>> seen;
     for (std::string_view rest = text; !rest.empty();) {
-        std::string name;
-        int32_t id = -1;
         const std::string_view whole = TakeLine(rest);
-        const bool is_account =
-            whole.find('\0') == whole.npos && lines.parse(whole, name, id) == 0 && !IsDomainName(name);
-        if (!is_account || !seen.insert(name).second) {
+        const Result<NameAndId> account = lines.parse(whole);
+        const bool is_account = whole.find('\0') == whole.npos && account && !IsDomainName(account->name);
+        if (!is_account || !seen.insert(account->name).second) {
             // Comments mean nothing to the system. A line may hold a hash, so the log has only its first field.
             if (!whole.empty() && !whole.starts_with('#'))
                 review.dropped.emplace_back(whole.substr(0, std::min(whole.find(':'), kLongestBeginning)));
             continue;
         }
-        const std::string as_it_stands = name + '\0';
-        const std::string key = AccountKey(name, lines.key_size).value_or(as_it_stands);
+        const std::string as_it_stands = account->name + '\0';
+        const std::string key = AccountKey(account->name, lines.key_size).value_or(as_it_stands);
         if (review.lost.empty() && !kept.contains(key) && !kept.contains(as_it_stands) &&
             !names.Deleted().contains(key))
-            review.lost = name;
+            review.lost = account->name;
     }
     return review;
 }

@@ -3,6 +3,7 @@
 #define TAVO_ACCOUNT_DETAIL_INDEXED_ACCOUNTS_H
 
 #include "account/detail/btree.h"
+#include "core/detail/result.h"
 
 #include <cstdint>
 #include <vector>
@@ -16,9 +17,14 @@ struct IndexedAccount {
     std::string line;  // of the file that says which accounts there are
 };
 
-// How the lines of a family are read: name and id, or an error code.
+struct NameAndId {
+    std::string name;
+    int32_t id;
+};
+
+// How the lines of a family are read.
 struct AccountLines {
-    int (*parse)(std::string_view line, std::string &name, int32_t &id);
+    Result<NameAndId> (*parse)(std::string_view line);
     const char *path;  // the text file that they stand in
     size_t key_size;
 };
@@ -32,8 +38,8 @@ std::string_view LineOf(std::string_view value);
 bool IsOneLine(std::string_view line);
 
 // Reads every account, also those that share an id with another one. ERR_FORMAT_ERROR when an entry is not an account.
-int CollectAccounts(Btree &index, Btree &names, const AccountLines &lines, AccountKeys &keys,
-                    std::vector<IndexedAccount> &accounts);
+Code CollectAccounts(Btree &index, Btree &names, const AccountLines &lines, AccountKeys &keys,
+                     std::vector<IndexedAccount> &accounts);
 
 // The lines of a text file that is rewritten from the stores.
 struct FileReview {

@@ -7,13 +7,12 @@
 
 namespace tavo {
 
-int ParseMiscLine(std::string_view text, MiscLine &line)
+Result<MiscLine> ParseMiscLine(std::string_view text)
 {
     const std::vector<std::string_view> fields = SplitColons(text);
     if (fields.size() != 3)
         return ERR_FORMAT_ERROR;
-    line = {std::string(fields[0]), FieldNumber(fields[1]).value_or(0), std::string(fields[2])};
-    return 0;
+    return MiscLine{std::string(fields[0]), FieldNumber(fields[1]).value_or(0), std::string(fields[2])};
 }
 
 std::string FormatMiscLine(const MiscLine &line)

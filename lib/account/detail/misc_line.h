@@ -2,6 +2,8 @@
 #ifndef TAVO_ACCOUNT_DETAIL_MISC_LINE_H
 #define TAVO_ACCOUNT_DETAIL_MISC_LINE_H
 
+#include "core/detail/result.h"
+
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -19,8 +21,8 @@ inline constexpr char kUidMarker[] = "_@UID__INDEX@_";
 inline constexpr char kGidMarker[] = "_@GID__INDEX@_";
 inline constexpr char kMiscComment[] = "# record user misc, format \"user_name:user_privilege:user_mail\"\n";
 
-// Returns 0, or ERR_FORMAT_ERROR when there are not three fields. A privilege that is not a number reads as 0.
-int ParseMiscLine(std::string_view text, MiscLine &line);
+// ERR_FORMAT_ERROR when there are not three fields. A privilege that is not a number reads as 0.
+Result<MiscLine> ParseMiscLine(std::string_view text);
 
 std::string FormatMiscLine(const MiscLine &line);
 

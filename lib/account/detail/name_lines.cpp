@@ -46,7 +46,7 @@ void NameLines::Append(const std::string &line)
     changed_ = true;
 }
 
-int NameLines::Compose(unsigned target, mode_t mode_of_new, AccountCommit &commit)
+Code NameLines::Compose(unsigned target, mode_t mode_of_new, AccountCommit &commit)
 {
     if (!changed_)
         return 0;

@@ -4,6 +4,7 @@
 #define TAVO_ACCOUNT_DETAIL_NAME_LINES_H
 
 #include "account/detail/account_commit.h"
+#include "core/detail/result.h"
 
 #include <functional>
 #include <string>
@@ -29,7 +30,7 @@ class NameLines {
     bool IsChanged() const { return changed_; }
 
     // Adds the new file to a commit, when it has changed. 0 or a code of AccountCommit::WriteNeighbour.
-    int Compose(unsigned target, mode_t mode_of_new, AccountCommit &commit);
+    Code Compose(unsigned target, mode_t mode_of_new, AccountCommit &commit);
 
   private:
     const char *path_;

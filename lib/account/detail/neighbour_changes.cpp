@@ -52,7 +52,7 @@ void NeighbourChanges::ComposeOne(unsigned target)
     LogFollowUp(failure, where_);
 }
 
-int NeighbourChanges::ComposeTarget(unsigned target, const std::vector<NameStep> &steps)
+Code NeighbourChanges::ComposeTarget(unsigned target, const std::vector<NameStep> &steps)
 {
     const KeepFault keep;
     if (target == kMemberLists)
@@ -62,14 +62,14 @@ int NeighbourChanges::ComposeTarget(unsigned target, const std::vector<NameStep>
     return ComposeNeighbour(target, steps, backup_, commit_);
 }
 
-int NeighbourChanges::ComposeMembers(const std::vector<NameStep> &steps)
+Code NeighbourChanges::ComposeMembers(const std::vector<NameStep> &steps)
 {
     NameMap map;
     for (const NameStep &step : steps)
         map.Add(step);
     auto groups = std::make_unique<AccountSession>(kGroupKind);
     bool changed = false;
-    int code = groups->OpenToChange(TAVO_LOCK_GROUP);
+    Code code = groups->OpenToChange(TAVO_LOCK_GROUP);
     if (code == 0)
         code = groups->Merge();
     if (code == 0)
@@ -105,7 +105,7 @@ void NeighbourChanges::AfterCommit(unsigned pending_before)
     const unsigned pending = Pending();
     // A group file that could not be moved leaves the stores without a seal, and the next call rebuilds them.
     if (groups_ && (pending & kMemberLists) == 0)
-        groups_->SealWritten();
+        (void)groups_->SealWritten();
     groups_.reset();
     for (const unsigned target : kTargets)
         if ((pending & ~pending_before & target) != 0)

@@ -5,6 +5,7 @@
 #include "account/detail/account_commit.h"
 #include "account/detail/account_session.h"
 #include "account/detail/neighbour_files.h"
+#include "core/detail/result.h"
 #include "core/detail/where.h"
 
 #include <memory>
@@ -41,8 +42,8 @@ class NeighbourChanges {
 
   private:
     void ComposeOne(unsigned target);
-    int ComposeTarget(unsigned target, const std::vector<NameStep> &steps);
-    int ComposeMembers(const std::vector<NameStep> &steps);
+    Code ComposeTarget(unsigned target, const std::vector<NameStep> &steps);
+    Code ComposeMembers(const std::vector<NameStep> &steps);
 
     AccountCommit &commit_;
     const Where where_;

@@ -28,20 +28,20 @@ void ReplaceAll(std::string &text, std::string_view from, std::string_view to)
 }
 
 template <class Change>
-int ChangeText(unsigned target, const char *path, AccountCommit &commit, Change change)
+Code ChangeText(unsigned target, const char *path, AccountCommit &commit, Change change)
 {
     FileRewrite file;
-    const int code = file.Open(path);
+    const Code code = file.Open(path);
     if (code != 0)
-        return file.IsMissing() ? 0 : code;
+        return file.IsMissing() ? Code() : code;
     std::string text;
     if (!file.Read(text))
         return ERR_READ_FAILED;
     const std::string changed = change(text);
-    return changed == text ? 0 : commit.WriteNeighbour(target, file, changed, kModeOfNew);
+    return changed == text ? Code() : commit.WriteNeighbour(target, file, changed, kModeOfNew);
 }
 
-int ComposeSambaLists(const NameMap &names, AccountCommit &commit)
+Code ComposeSambaLists(const NameMap &names, AccountCommit &commit)
 {
     return ChangeText(kSambaLists, kSambaFile, commit, [&](std::string_view text) {
         return ChangeSmbUserLists(text, [&](std::string_view name, bool is_group) {
@@ -51,7 +51,7 @@ int ComposeSambaLists(const NameMap &names, AccountCommit &commit)
     });
 }
 
-int ComposeShareLists(const NameMap &names, AccountCommit &commit)
+Code ComposeShareLists(const NameMap &names, AccountCommit &commit)
 {
     HashOwner hash(PshTLIBSzHashAlloc(1024));
     for (const auto &[key, name] : names.Names())
@@ -61,7 +61,7 @@ int ComposeShareLists(const NameMap &names, AccountCommit &commit)
                       [&](std::string_view text) { return ChangeShareGroups(text, hash.Get()); });
 }
 
-int ComposeFtpList(const std::vector<NameStep> &steps, AccountCommit &commit)
+Code ComposeFtpList(const std::vector<NameStep> &steps, AccountCommit &commit)
 {
     FtpChrootList list;
     for (const NameStep &step : steps)
@@ -70,14 +70,14 @@ int ComposeFtpList(const std::vector<NameStep> &steps, AccountCommit &commit)
     return list.Compose(kFtpList, commit);
 }
 
-int ComposeBackupUsers(const std::vector<NameStep> &steps, NetBackupUsers &backup, AccountCommit &commit)
+Code ComposeBackupUsers(const std::vector<NameStep> &steps, NetBackupUsers &backup, AccountCommit &commit)
 {
     bool read = true;
     for (const NameStep &step : steps)
         read = (step.new_name.empty() ? backup.Remove(step.old_name)
                                       : backup.Set(step.old_name, step.new_name, nullptr)) &&
                read;
-    return read ? backup.Compose(kBackupUsers, commit) : int{ERR_READ_FAILED};
+    return read ? backup.Compose(kBackupUsers, commit) : Code(ERR_READ_FAILED);
 }
 
 }  // namespace
@@ -91,15 +91,15 @@ void RemoveNeighbourTemporaries() noexcept
     }
 }
 
-int ComposeBackup(NetBackupUsers &backup, AccountCommit &commit)
+Code ComposeBackup(NetBackupUsers &backup, AccountCommit &commit)
 {
-    const int code = backup.IsUnreadable() ? int{ERR_READ_FAILED} : backup.Compose(kBackupUsers, commit);
+    const Code code = backup.IsUnreadable() ? Code(ERR_READ_FAILED) : backup.Compose(kBackupUsers, commit);
     if (code != 0)
         commit.Withdraw(kBackupUsers);
     return code;
 }
 
-int ComposeGuestModule(bool may_enter, AccountCommit &commit)
+Code ComposeGuestModule(bool may_enter, AccountCommit &commit)
 {
     if (::access(kAfpdConf, F_OK) != 0 && errno == ENOENT)
         return ERR_FILE_NOT_FOUND;
@@ -111,15 +111,16 @@ int ComposeGuestModule(bool may_enter, AccountCommit &commit)
     });
 }
 
-int ComposeNeighbour(unsigned target, const std::vector<NameStep> &steps, NetBackupUsers &backup, AccountCommit &commit)
+Code ComposeNeighbour(unsigned target, const std::vector<NameStep> &steps, NetBackupUsers &backup,
+                      AccountCommit &commit)
 {
-    int code = 0;
+    Code code = 0;
     if (target == kFtpList) {
         code = ComposeFtpList(steps, commit);
     } else if (target == kBackupUsers) {
         code = ComposeBackupUsers(steps, backup, commit);
     } else if (target == kGuestModule) {
-        code = steps.empty() ? 0 : ComposeGuestModule(steps.back().new_name == "yes", commit);
+        code = steps.empty() ? Code() : ComposeGuestModule(steps.back().new_name == "yes", commit);
     } else {
         NameMap names;
         for (const NameStep &step : steps)

@@ -55,9 +55,9 @@ bool NetBackupUsers::Remove(const std::string &name)
 }
 
 // The secrets of a user who loses the authorisation are removed first.
-int NetBackupUsers::Compose(unsigned target, AccountCommit &commit)
+Code NetBackupUsers::Compose(unsigned target, AccountCommit &commit)
 {
-    const int code = secrets_.Compose(target, 0600, commit);
+    const Code code = secrets_.Compose(target, 0600, commit);
     return code != 0 ? code : authorised_.Compose(target, 0600, commit);
 }
 

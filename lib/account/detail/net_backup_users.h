@@ -4,6 +4,7 @@
 #define TAVO_ACCOUNT_DETAIL_NET_BACKUP_USERS_H
 
 #include "account/detail/name_lines.h"
+#include "core/detail/result.h"
 
 namespace tavo {
 
@@ -23,7 +24,7 @@ class NetBackupUsers {
     bool IsChanged() const { return authorised_.IsChanged() || secrets_.IsChanged(); }
 
     // Adds what has changed to a commit. 0 or a code of AccountCommit::WriteNeighbour.
-    int Compose(unsigned target, AccountCommit &commit);
+    Code Compose(unsigned target, AccountCommit &commit);
 
   private:
     NameLines authorised_{kNetBackupUsers};

@@ -7,7 +7,7 @@
 
 namespace tavo {
 
-int ParsePasswdLine(std::string_view text, PasswdLine &line)
+Result<PasswdLine> ParsePasswdLine(std::string_view text)
 {
     const std::vector<std::string_view> fields = SplitColons(text);
     if (fields.size() != 7)
@@ -18,9 +18,8 @@ int ParsePasswdLine(std::string_view text, PasswdLine &line)
     const std::optional<int32_t> gid = FieldNumber(fields[3]);
     if (!uid || !gid)
         return ERR_FORMAT_ERROR;
-    line = {std::string(fields[0]), *uid, *gid, DecodeColons(fields[4]), std::string(fields[5]),
-            std::string(fields[6])};
-    return 0;
+    return PasswdLine{std::string(fields[0]), *uid, *gid, DecodeColons(fields[4]), std::string(fields[5]),
+                      std::string(fields[6])};
 }
 
 std::string FormatPasswdLine(const PasswdLine &line)

@@ -2,6 +2,8 @@
 #ifndef TAVO_ACCOUNT_DETAIL_PASSWD_LINE_H
 #define TAVO_ACCOUNT_DETAIL_PASSWD_LINE_H
 
+#include "core/detail/result.h"
+
 #include <cstdint>
 #include <string>
 #include <string_view>
@@ -17,8 +19,8 @@ struct PasswdLine {
     std::string shell;
 };
 
-// 0, ERR_FORMAT_ERROR when there are not seven fields with two numbers, ERR_INVALID_USERNAME when the name is empty.
-int ParsePasswdLine(std::string_view text, PasswdLine &line);
+// ERR_FORMAT_ERROR when there are not seven fields with two numbers, ERR_INVALID_USERNAME when the name is empty.
+Result<PasswdLine> ParsePasswdLine(std::string_view text);
 
 std::string FormatPasswdLine(const PasswdLine &line);
 

@@ -13,19 +13,19 @@ namespace {
 constexpr int32_t kReplacement = 0xFFFD;
 
 // The code of a conversion that gave this length.
-int LengthCode(int32_t length)
+Code LengthCode(int32_t length)
 {
     if (length == kNoMemory)
         throw std::bad_alloc();
     return length < 0 ? ERR_OP_FAILURE : 0;
 }
 
-int Utf16(const Extras &extras, std::string_view utf8, SecretUtf16 &units)
+Code Utf16(const Extras &extras, std::string_view utf8, SecretUtf16 &units)
 {
     units.resize(utf8.size() + 1);  // no character has more units than it has bytes
     const int32_t length = extras.to_utf16(utf8.data(), static_cast<int32_t>(utf8.size()), kReplacement, units.data(),
                                            static_cast<int32_t>(units.size()));
-    const int code = LengthCode(length);
+    const Code code = LengthCode(length);
     units.resize(code == 0 ? static_cast<size_t>(length) : 0);
     return code;
 }
@@ -37,13 +37,13 @@ bool IsHighSurrogate(char16_t unit)
 
 }  // namespace
 
-int UpperCodePage850(std::string_view utf8, SecretBytes &bytes)
+Code UpperCodePage850(std::string_view utf8, SecretBytes &bytes)
 {
     const Extras *extras = LoadExtras();
     if (!extras)
         return ERR_OP_FAILURE;
     SecretUtf16 units;
-    if (const int code = Utf16(*extras, utf8, units))
+    if (const Code code = Utf16(*extras, utf8, units))
         return code;
     SecretUtf16 upper;
     upper.reserve(units.size());
@@ -55,18 +55,18 @@ int UpperCodePage850(std::string_view utf8, SecretBytes &bytes)
     bytes.resize(2 * upper.size() + 1);
     const int32_t length = extras->to_code_page_850(upper.data(), static_cast<int32_t>(upper.size()), bytes.data(),
                                                     static_cast<int32_t>(bytes.size()));
-    const int code = LengthCode(length);
+    const Code code = LengthCode(length);
     bytes.resize(code == 0 ? static_cast<size_t>(length) : 0);
     return code;
 }
 
-int Utf16LowFirst(std::string_view utf8, SecretBytes &bytes)
+Code Utf16LowFirst(std::string_view utf8, SecretBytes &bytes)
 {
     const Extras *extras = LoadExtras();
     if (!extras)
         return ERR_OP_FAILURE;
     SecretUtf16 units;
-    if (const int code = Utf16(*extras, utf8, units))
+    if (const Code code = Utf16(*extras, utf8, units))
         return code;
     bytes.clear();
     bytes.reserve(2 * units.size());

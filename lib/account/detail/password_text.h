@@ -3,6 +3,7 @@
 #define TAVO_ACCOUNT_DETAIL_PASSWORD_TEXT_H
 
 #include "account/detail/secret_text.h"
+#include "core/detail/result.h"
 
 #include <string_view>
 
@@ -10,10 +11,10 @@ namespace tavo {
 
 // Upper-case, character by character: "ß" stays one. A password that cannot be converted is never taken for an empty
 // one: 0, or ERR_OP_FAILURE when ICU cannot convert or cannot be loaded. Throws bad_alloc.
-int UpperCodePage850(std::string_view utf8, SecretBytes &bytes);
+Code UpperCodePage850(std::string_view utf8, SecretBytes &bytes);
 
 // UTF-16, the low byte of each unit first. The same codes.
-int Utf16LowFirst(std::string_view utf8, SecretBytes &bytes);
+Code Utf16LowFirst(std::string_view utf8, SecretBytes &bytes);
 
 }  // namespace tavo
 

@@ -14,26 +14,26 @@ namespace tavo {
 namespace {
 
 // Not the whole record: programs that are not root have quotas, too, and no business with hashes.
-int FindUid(const char *name, int32_t &uid)
+Code FindUid(const char *name, int32_t &uid)
 {
     const std::optional<std::string> key = AccountKey(name);
     if (!key)
         return ERR_NO_SUCH_USER;
     AccountSession session(kUserKind);
-    if (const int code = session.OpenToRead(std::array{size_t{kNameStore}}))
+    if (const Code code = session.OpenToRead(std::array{size_t{kNameStore}}))
         return code;
-    PasswdLine line;
-    const int code = ReadPasswdLine(*session.View(kNameStore), *key, line);
-    uid = line.uid;
-    return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
+    const Result<PasswdLine> line = ReadPasswdLine(*session.View(kNameStore), *key);
+    if (line)
+        uid = line->uid;
+    return line.Failure().Renaming(ERR_KEY_NOT_FOUND, ERR_NO_SUCH_USER);
 }
 
 }  // namespace
 
-int FindQuotaUser(const char *name, int32_t &uid)
+Code FindQuotaUser(const char *name, int32_t &uid)
 {
     const KeepFault keep;
-    const int code = FindUid(name, uid);
+    const Code code = FindUid(name, uid);
     if (code != ERR_NO_SUCH_USER)
         return code;
     // Groups have no quotas, whichever way they are spelled in lists of names.

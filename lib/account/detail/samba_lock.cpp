@@ -40,13 +40,13 @@ bool LockOpenFile(int fd, int seconds) noexcept
     return true;
 }
 
-int SambaLock::Take(int seconds) noexcept
+Code SambaLock::Take(int seconds) noexcept
 {
     const char *path = kUserTextRows[kSmbText].path;
     for (int tries = 0; tries < kReplacements; ++tries) {
         old_ = OpenFd(path, O_RDWR | O_NOFOLLOW);
         if (!old_)
-            return errno == EMFILE || errno == ENFILE || errno == ENOMEM ? int{ERR_LOCK_FAILED} : 0;
+            return errno == EMFILE || errno == ENFILE || errno == ENOMEM ? ERR_LOCK_FAILED : ERR_SUCCESS;
         if (!LockOpenFile(old_.Get(), seconds))
             return ERR_LOCK_FAILED;
         if (HasTheName(old_.Get(), path))

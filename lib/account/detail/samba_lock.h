@@ -3,6 +3,7 @@
 #define TAVO_ACCOUNT_DETAIL_SAMBA_LOCK_H
 
 #include "core/detail/owner.h"
+#include "core/detail/result.h"
 
 namespace tavo {
 
@@ -14,7 +15,7 @@ class SambaLock {
   public:
     // Locks the file that has the name when the lock is held: a program that waited for a file which was replaced
     // meanwhile opens the new one, and so do we. 0, also when there is no such file; ERR_LOCK_FAILED.
-    int Take(int seconds) noexcept;
+    Code Take(int seconds) noexcept;
 
     // Locks the new file before it gets the name, so that it does not change until its time stamps are recorded.
     void TakeNew(int fd) noexcept;

@@ -25,17 +25,15 @@ std::string JoinColons(const std::vector<std::string_view> &fields)
 
 }  // namespace
 
-int ParseShadowLine(std::string_view text, ShadowLine &line)
+Result<ShadowLine> ParseShadowLine(std::string_view text)
 {
     const std::vector<std::string_view> fields = SplitColons(text);
     if (fields.size() != kFields)
         return ERR_FORMAT_ERROR;
-    line.name = fields[kName];
-    line.hash = fields[kHash];
-    line.expire = FieldNumber(fields[kExpire]).value_or(-1);
     // Lines of other tools may leave both ages empty: that sets no limit.
-    line.cannot_change = FieldNumber(fields[kMax]).value_or(kMaxAge) <= FieldNumber(fields[kMin]).value_or(0);
-    return 0;
+    const bool cannot_change = FieldNumber(fields[kMax]).value_or(kMaxAge) <= FieldNumber(fields[kMin]).value_or(0);
+    return ShadowLine{std::string(fields[kName]), std::string(fields[kHash]), FieldNumber(fields[kExpire]).value_or(-1),
+                      cannot_change};
 }
 
 std::string FormatShadowLine(const ShadowLine &line, time_t now)
@@ -45,19 +43,19 @@ std::string FormatShadowLine(const ShadowLine &line, time_t now)
     return text + (line.expire < 0 ? "" : std::to_string(line.expire)) + ':';
 }
 
-int ReplaceShadowHash(std::string_view text, std::string_view hash, std::string &out)
+Result<std::string> ReplaceShadowHash(std::string_view text, std::string_view hash)
 {
     const std::vector<std::string_view> fields = SplitColons(text);
     if (fields.size() != kFields)
         return ERR_FORMAT_ERROR;
-    out.assign(fields[kName]).append(":").append(hash);
+    std::string line(fields[kName]);
+    line.append(":").append(hash);
     for (const int kept : {kLastChange, kMin, kMax})
-        out.append(":").append(fields[static_cast<size_t>(kept)]);
-    out.append(":7::").append(fields[kExpire]).append(":");
-    return 0;
+        line.append(":").append(fields[static_cast<size_t>(kept)]);
+    return line.append(":7::").append(fields[kExpire]).append(":");
 }
 
-int ReplaceShadowAges(std::string_view text, const ShadowAges &ages, std::string &out)
+Result<std::string> ReplaceShadowAges(std::string_view text, const ShadowAges &ages)
 {
     std::vector<std::string_view> fields = SplitColons(text);
     if (fields.size() != kFields)
@@ -75,11 +73,10 @@ int ReplaceShadowAges(std::string_view text, const ShadowAges &ages, std::string
     set(kMin, ages.least);
     set(kMax, ages.most);
     set(kWarn, ages.warning);
-    out = JoinColons(fields);
-    return 0;
+    return JoinColons(fields);
 }
 
-int ReplaceShadowLock(std::string_view text, bool locked, std::string &out)
+Result<std::string> ReplaceShadowLock(std::string_view text, bool locked)
 {
     std::vector<std::string_view> fields = SplitColons(text);
     if (fields.size() != kFields)
@@ -93,8 +90,7 @@ int ReplaceShadowLock(std::string_view text, bool locked, std::string &out)
             return ERR_BAD_PARAMETERS;
     }
     fields[kHash] = hash;
-    out = JoinColons(fields);
-    return 0;
+    return JoinColons(fields);
 }
 
 }  // namespace tavo

@@ -70,12 +70,12 @@ std::string ChangeShareGroups(std::string_view text, const TLIBSZHASH *names)
     return changed;
 }
 
-int ChangeGroupsInShares(const TLIBSZHASH *names)
+Code ChangeGroupsInShares(const TLIBSZHASH *names)
 {
     FileRewrite file;
-    const int code = file.Open(kShareFile);
+    const Code code = file.Open(kShareFile);
     if (code != 0)
-        return file.IsMissing() ? 0 : code;
+        return file.IsMissing() ? Code() : code;
     std::string text;
     if (!file.Read(text))
         return ERR_READ_FAILED;

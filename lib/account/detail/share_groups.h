@@ -4,6 +4,7 @@
 #define TAVO_ACCOUNT_DETAIL_SHARE_GROUPS_H
 
 #include "core/detail/list_owner.h"
+#include "core/detail/result.h"
 
 #include <string>
 #include <string_view>
@@ -15,7 +16,7 @@ namespace tavo {
 std::string ChangeShareGroups(std::string_view text, const TLIBSZHASH *names);
 
 // Makes these changes in the file. Returns 0, also when there is no file; or a code of the rewrite, the file unchanged.
-int ChangeGroupsInShares(const TLIBSZHASH *names);
+Code ChangeGroupsInShares(const TLIBSZHASH *names);
 
 }  // namespace tavo
 

@@ -15,15 +15,14 @@ constexpr size_t kSmbFlags = 11;  // between the brackets, with blanks
 
 }  // namespace
 
-int ParseSmbpasswdLine(std::string_view text, SmbpasswdLine &line)
+Result<SmbpasswdLine> ParseSmbpasswdLine(std::string_view text)
 {
     const std::vector<std::string_view> fields = SplitColons(text);
     if (fields.size() != 7)
         return ERR_FORMAT_ERROR;
-    line = {std::string(fields[0]), FieldNumber(fields[1]).value_or(-1),
-            std::string(fields[2]), std::string(fields[3]),
-            std::string(fields[4]), std::string(fields[5])};
-    return 0;
+    return SmbpasswdLine{std::string(fields[0]), FieldNumber(fields[1]).value_or(-1),
+                         std::string(fields[2]), std::string(fields[3]),
+                         std::string(fields[4]), std::string(fields[5])};
 }
 
 std::string FormatSmbpasswdLine(const SmbpasswdLine &line)

@@ -2,6 +2,8 @@
 #ifndef TAVO_ACCOUNT_DETAIL_SMBPASSWD_LINE_H
 #define TAVO_ACCOUNT_DETAIL_SMBPASSWD_LINE_H
 
+#include "core/detail/result.h"
+
 #include <cstdint>
 #include <ctime>
 #include <string>
@@ -21,8 +23,8 @@ struct SmbpasswdLine {
 // Replaces both hashes when there are none: Samba then refuses every login.
 inline constexpr char kNoSmbHash[] = "XXXXXXXXXXXXXXXXXXXXXXXXXXXXXXXX";
 
-// 0, or ERR_FORMAT_ERROR when there are not seven fields.
-int ParseSmbpasswdLine(std::string_view text, SmbpasswdLine &line);
+// ERR_FORMAT_ERROR when there are not seven fields.
+Result<SmbpasswdLine> ParseSmbpasswdLine(std::string_view text);
 
 std::string FormatSmbpasswdLine(const SmbpasswdLine &line);
 

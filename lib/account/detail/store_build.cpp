@@ -84,19 +84,19 @@ class BuildFolder {
     bool made_ = false;
 };
 
-int FillStore(const char *path, const StoreEntries &entries, int64_t sync_time)
+Code FillStore(const char *path, const StoreEntries &entries, int64_t sync_time)
 {
     std::unique_ptr<Btree> store;
-    if (const int code = Btree::Create(path, store))
+    if (const Code code = Btree::Create(path, store))
         return code;
     for (const auto &[key, value] : entries)
-        if (const int code = store->Set(key, value))
+        if (const Code code = store->Set(key, value))
             return code;
-    if (const int code = store->SetNumber(kDeprecatedKey, 0))
+    if (const Code code = store->SetNumber(kDeprecatedKey, 0))
         return code;
-    if (const int code = store->SetNumber(kSyncTimeKey, static_cast<int32_t>(sync_time)))
+    if (const Code code = store->SetNumber(kSyncTimeKey, static_cast<int32_t>(sync_time)))
         return code;
-    const int code = store->Flush();
+    const Code code = store->Flush();
     return code != 0 ? code : store->Close();
 }
 
@@ -138,12 +138,12 @@ bool ReadContent(const AccountKind &kind, StoreContent &out)
     return true;
 }
 
-int BuildStores(const AccountKind &kind, std::string &texts)
+Code BuildStores(const AccountKind &kind, std::string &texts)
 {
     const StoreFamily &family = kind.family;
     std::vector<StoreEntries> domain = ReadDomainPart(kind);
     BreakSeal(family);
-    if (const int code = FinishAccountFiles())
+    if (const Code code = FinishAccountFiles())
         return code;
     texts = StampTexts(family);
     StoreContent content;
@@ -154,8 +154,8 @@ int BuildStores(const AccountKind &kind, std::string &texts)
     RemoveLeftFolders(family);
     const BuildFolder folder(family);
     if (!folder)
-        return errno == ENOSPC ? int{ERR_NOT_ENOUGH_SPACE} : int{ERR_OPEN_FAILED};
-    int code = 0;
+        return errno == ENOSPC ? ERR_NOT_ENOUGH_SPACE : ERR_OPEN_FAILED;
+    Code code = 0;
     for (size_t i = 0; i < family.stores.size() && code == 0; ++i)
         code = FillStore(folder.File(i), content.stores[i], content.sync_times[i]);
     for (size_t i = 0; i < family.stores.size() && code == 0; ++i)
@@ -163,7 +163,7 @@ int BuildStores(const AccountKind &kind, std::string &texts)
             code = ERR_OPEN_FAILED;
     if (code == 0)
         WriteSeal(family, texts);
-    return code == 0 ? 0 : CodeOfStores(code);
+    return code == 0 ? code : CodeOfStores(code);
 }
 
 }  // namespace tavo

@@ -7,6 +7,7 @@
 #include "account/detail/account_name.h"
 #include "account/detail/store_content.h"
 #include "account/detail/store_family.h"
+#include "core/detail/result.h"
 
 namespace tavo {
 
@@ -27,9 +28,9 @@ inline StoreContents ContentsOf(const AccountKind &kind, size_t store)
 }
 
 // The caller's code for stores that cannot be opened or built: lack of memory or space, else ERR_OPEN_FAILED.
-inline int CodeOfStores(int code)
+inline Code CodeOfStores(Code code)
 {
-    return code == ERR_NOT_ENOUGH_SPACE || code == ERR_OUT_OF_MEMORY ? code : int{ERR_OPEN_FAILED};
+    return code == ERR_NOT_ENOUGH_SPACE || code == ERR_OUT_OF_MEMORY ? code : Code(ERR_OPEN_FAILED);
 }
 
 // Computes the entries of the stores from the text files. False when a file exists but cannot be read.
@@ -40,7 +41,7 @@ bool ReadContent(const AccountKind &kind, StoreContent &out);
 // entries of domain accounts stay. The locks must be held exclusively.
 // `texts` becomes what the text files looked like when they were read.
 // 0, ERR_OPEN_FAILED, ERR_READ_FAILED, ERR_NOT_ENOUGH_SPACE, ERR_OUT_OF_MEMORY or ERR_RENAME_FAILED.
-int BuildStores(const AccountKind &kind, std::string &texts);
+Code BuildStores(const AccountKind &kind, std::string &texts);
 
 }  // namespace tavo
 

@@ -5,6 +5,8 @@
 
 #include "tavo_error.h"
 
+#include "core/detail/result.h"
+
 #include <string_view>
 
 namespace tavo {
@@ -18,29 +20,37 @@ class StoreView {
     StoreView(const StoreView &) = delete;
     StoreView &operator=(const StoreView &) = delete;
 
-    // The views stay valid until the next call. Absent: ERR_KEY_NOT_FOUND.
-    virtual int Get(std::string_view key, std::string_view &value) const = 0;
+    // The view stays valid until the next call. Absent: ERR_KEY_NOT_FOUND.
+    virtual Result<std::string_view> Get(std::string_view key) const = 0;
 
     // The entries in the order of their keys, without the reserved ones. Past the end: ERR_DB_END.
-    virtual int Walk(Entry which, std::string_view &key, std::string_view &value) = 0;
+    virtual Code Walk(Entry which, std::string_view &key, std::string_view &value) = 0;
 };
 
 // A store that cannot be read says nothing about what is in it: 0 when the key is absent, `present` when it is there,
 // else the code of the failure.
-inline int RequireAbsent(const StoreView &store, std::string_view key, int present)
+inline Code RequireAbsent(const StoreView &store, std::string_view key, int present)
 {
-    std::string_view value;
-    const int code = store.Get(key, value);
-    return code == 0 ? present : code == ERR_KEY_NOT_FOUND ? 0 : code;
+    const Result<std::string_view> value = store.Get(key);
+    return value ? Code(present) : value.Failure().Renaming(ERR_KEY_NOT_FOUND, ERR_SUCCESS);
+}
+
+// A code of the store, of the parser, or the line of a key.
+template <class Line>
+Result<Line> ReadLine(const StoreView &store, std::string_view key, Result<Line> (*parse)(std::string_view))
+{
+    const Result<std::string_view> value = store.Get(key);
+    return value ? parse(*value) : value.Failure();
 }
 
 // An absent line leaves the record unchanged.
 template <class Line>
-int ReadOptional(const StoreView &store, std::string_view key, int (*parse)(std::string_view, Line &), Line &line)
+Code ReadOptional(const StoreView &store, std::string_view key, Result<Line> (*parse)(std::string_view), Line &line)
 {
-    std::string_view value;
-    const int code = store.Get(key, value);
-    return code == 0 ? parse(value, line) : code == ERR_KEY_NOT_FOUND ? 0 : code;
+    Result<Line> found = ReadLine(store, key, parse);
+    if (found)
+        line = std::move(*found);
+    return found.Failure().Renaming(ERR_KEY_NOT_FOUND, ERR_SUCCESS);
 }
 
 }  // namespace tavo

@@ -46,7 +46,7 @@ class TextStores::Lines : public StoreView {
   public:
     Lines(TextStores &stores, size_t index) : stores_(stores), index_(index) {}
 
-    int Get(std::string_view key, std::string_view &value) const override
+    Result<std::string_view> Get(std::string_view key) const override
     {
         if (IsSecret())
             return ERR_ACCESS_DENIED;
@@ -60,11 +60,10 @@ class TextStores::Lines : public StoreView {
         const auto found = entries->find(key);
         if (found == entries->end())
             return ERR_KEY_NOT_FOUND;
-        value = found->second;
-        return 0;
+        return std::string_view(found->second);
     }
 
-    int Walk(Entry which, std::string_view &key, std::string_view &value) override
+    Code Walk(Entry which, std::string_view &key, std::string_view &value) override
     {
         if (IsSecret())
             return ERR_ACCESS_DENIED;
@@ -91,7 +90,7 @@ class TextStores::Lines : public StoreView {
     StoreEntries::const_iterator next_;
 };
 
-int TextStores::Open(std::span<const size_t> stores)
+Code TextStores::Open(std::span<const size_t> stores)
 {
     const StoreFamily &family = kind_.family;
     texts_.assign(family.texts.size(), {});

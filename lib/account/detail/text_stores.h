@@ -5,6 +5,7 @@
 
 #include "account/detail/store_build.h"
 #include "account/detail/store_view.h"
+#include "core/detail/result.h"
 
 #include <memory>
 #include <span>
@@ -19,7 +20,7 @@ class TextStores {
 
     // Reads the files of these stores, and the one that says which accounts there are. A store of secrets can be
     // requested; look-ups in it then fail with ERR_ACCESS_DENIED. 0, ERR_ACCESS_DENIED or ERR_READ_FAILED.
-    int Open(std::span<const size_t> stores);
+    Code Open(std::span<const size_t> stores);
 
     StoreView *View(size_t index) const { return views_[index].get(); }
 

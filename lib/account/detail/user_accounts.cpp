@@ -22,10 +22,9 @@ int Privilege(std::string_view key, const MiscLine &misc)
 }
 
 // Absent entries are no failure: accounts of the system have no Samba and misc lines.
-int DeleteEntry(TAVOBDB *store, std::string_view key)
+Code DeleteEntry(TAVOBDB *store, std::string_view key)
 {
-    const int code = Btree::Of(store)->Delete(key);
-    return code == ERR_KEY_NOT_FOUND ? 0 : code;
+    return Btree::Of(store)->Delete(key).Renaming(ERR_KEY_NOT_FOUND, ERR_SUCCESS);
 }
 
 }  // namespace
@@ -41,73 +40,69 @@ bool IsReservedKey(std::string_view key)
     return key == WithNul("ROOT") || key == WithNul("ADMIN");
 }
 
-int ReadPasswdLine(const StoreView &names, std::string_view key, PasswdLine &line)
+Result<PasswdLine> ReadPasswdLine(const StoreView &names, std::string_view key)
 {
-    std::string_view value;
-    const int code = names.Get(key, value);
-    return code == 0 ? ParsePasswdLine(value, line) : code;
+    return ReadLine(names, key, ParsePasswdLine);
 }
 
-int ReadPasswdLine(const TAVOUSERDB &db, std::string_view key, PasswdLine &line)
+Result<PasswdLine> ReadPasswdLine(const TAVOUSERDB &db, std::string_view key)
 {
-    return ReadPasswdLine(*Btree::Of(db.pName), key, line);
+    return ReadPasswdLine(*Btree::Of(db.pName), key);
 }
 
-int ReadUser(const AccountSession &session, std::string_view key, TAVOUSER **user)
+Code ReadUser(const AccountSession &session, std::string_view key, TAVOUSER **user)
 {
-    PasswdLine passwd;
     ShadowLine shadow;
     MiscLine misc;
     shadow.hash = kLocked;
-    int code = ReadPasswdLine(*session.View(kNameStore), key, passwd);
-    if (code != 0)
-        return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
-    if ((code = ReadOptional(*session.View(kShadowStore), key, ParseShadowLine, shadow)) != 0 ||
-        (code = ReadOptional(*session.View(kMiscStore), key, ParseMiscLine, misc)) != 0)
+    const Result<PasswdLine> passwd = ReadPasswdLine(*session.View(kNameStore), key);
+    if (!passwd)
+        return passwd.Failure().Renaming(ERR_KEY_NOT_FOUND, ERR_NO_SUCH_USER);
+    if (const Code code = ReadOptional(*session.View(kShadowStore), key, ParseShadowLine, shadow))
         return code;
-    if (TAVOUserAlloc(user, passwd.name.c_str(), shadow.hash.c_str(), passwd.uid, passwd.gid,
-                      passwd.description.c_str(), passwd.home.c_str(), passwd.shell.c_str(), shadow.expire,
+    if (const Code code = ReadOptional(*session.View(kMiscStore), key, ParseMiscLine, misc))
+        return code;
+    if (TAVOUserAlloc(user, passwd->name.c_str(), shadow.hash.c_str(), passwd->uid, passwd->gid,
+                      passwd->description.c_str(), passwd->home.c_str(), passwd->shell.c_str(), shadow.expire,
                       shadow.cannot_change, misc.mail.c_str(), Privilege(key, misc)) != 0)
         return tavoerrno;
     return 0;
 }
 
-int ReadPrivilege(const AccountSession &session, std::string_view key, int32_t &privilege)
+Code ReadPrivilege(const AccountSession &session, std::string_view key, int32_t &privilege)
 {
-    PasswdLine passwd;
     MiscLine misc;
-    int code = ReadPasswdLine(*session.View(kNameStore), key, passwd);
-    if (code == 0)
-        code = ReadOptional(*session.View(kMiscStore), key, ParseMiscLine, misc);
-    if (code != 0)
-        return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
+    const Result<PasswdLine> passwd = ReadPasswdLine(*session.View(kNameStore), key);
+    if (!passwd)
+        return passwd.Failure().Renaming(ERR_KEY_NOT_FOUND, ERR_NO_SUCH_USER);
+    if (const Code code = ReadOptional(*session.View(kMiscStore), key, ParseMiscLine, misc))
+        return code;
     privilege = Privilege(key, misc);
     return 0;
 }
 
-int FindUserKey(const AccountSession &session, int32_t uid, std::string &key)
+Result<std::string> FindUserKey(const AccountSession &session, int32_t uid)
 {
     const auto has_id = [](std::string_view text, int32_t id) {
-        PasswdLine line;
-        return ParsePasswdLine(text, line) == 0 && line.uid == id;
+        const Result<PasswdLine> line = ParsePasswdLine(text);
+        return line && line->uid == id;
     };
-    const int code = FindKeyById(*session.View(kUidStore), *session.View(kNameStore), uid, has_id, key);
-    return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
+    return FindKeyById(*session.View(kUidStore), *session.View(kNameStore), uid, has_id)
+        .Renaming(ERR_KEY_NOT_FOUND, ERR_NO_SUCH_USER);
 }
 
-int StoreUser(const TAVOUSERDB &db, const UserChange &change)
+Code StoreUser(const TAVOUSERDB &db, const UserChange &change)
 {
-    int code = 0;
     const bool renamed = !change.old_key.empty() && change.old_key != change.key;
     for (TAVOBDB *store : {db.pName, db.pMisc, db.pShadow, db.pSmb})
-        if (renamed && (code = DeleteEntry(store, change.old_key)) != 0)
+        if (const Code code = renamed ? DeleteEntry(store, change.old_key) : Code())
             return code;
     if (!change.keep_index) {
-        if (!change.old_key.empty() && HasIndex(*Btree::Of(db.pUid), change.old_uid, change.old_key) &&
-            (code = DeleteEntry(db.pUid, IdKey(change.old_uid))) != 0)
-            return code;
+        if (!change.old_key.empty() && HasIndex(*Btree::Of(db.pUid), change.old_uid, change.old_key))
+            if (const Code code = DeleteEntry(db.pUid, IdKey(change.old_uid)))
+                return code;
         // Of two accounts with one id the first keeps the index.
-        code = RequireAbsent(*Btree::Of(db.pUid), IdKey(change.uid), ERR_KEY_EXISTS);
+        Code code = RequireAbsent(*Btree::Of(db.pUid), IdKey(change.uid), ERR_KEY_EXISTS);
         if (code == 0)
             code = Btree::Of(db.pUid)->Set(IdKey(change.uid), change.key);
         if (code != 0 && code != ERR_KEY_EXISTS)
@@ -121,18 +116,18 @@ int StoreUser(const TAVOUSERDB &db, const UserChange &change)
                 {db.pShadow, change.shadow_line},
                 {db.pSmb, change.smb_line}};
     for (const auto &row : rows)
-        if ((code = Btree::Of(row.store)->Set(change.key, WithNul(row.line))) != 0)
+        if (const Code code = Btree::Of(row.store)->Set(change.key, WithNul(row.line)))
             return code;
     return 0;
 }
 
-int RemoveUser(const TAVOUSERDB &db, const std::string &key, int32_t uid)
+Code RemoveUser(const TAVOUSERDB &db, const std::string &key, int32_t uid)
 {
     if (HasIndex(*Btree::Of(db.pUid), uid, key))
-        if (const int code = DeleteEntry(db.pUid, IdKey(uid)))
+        if (const Code code = DeleteEntry(db.pUid, IdKey(uid)))
             return code;
     for (TAVOBDB *store : {db.pName, db.pMisc, db.pShadow, db.pSmb})
-        if (const int code = DeleteEntry(store, key))
+        if (const Code code = DeleteEntry(store, key))
             return code;
     return 0;
 }

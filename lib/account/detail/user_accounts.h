@@ -6,6 +6,7 @@
 
 #include "account/detail/passwd_line.h"
 #include "account/detail/store_view.h"
+#include "core/detail/result.h"
 
 #include <string>
 #include <string_view>
@@ -21,22 +22,22 @@ inline constexpr char kDefaultShell[] = "/bin/csh";
 // The stores of a session as the functions here, and callers, know them.
 TAVOUSERDB UserDb(const AccountSession &session);
 
-// 0, ERR_KEY_NOT_FOUND, ERR_FORMAT_ERROR, ERR_INVALID_USERNAME, ERR_DB_CURSOR ...
-int ReadPasswdLine(const StoreView &names, std::string_view key, PasswdLine &line);
-int ReadPasswdLine(const TAVOUSERDB &db, std::string_view key, PasswdLine &line);
+// ERR_KEY_NOT_FOUND, ERR_FORMAT_ERROR, ERR_INVALID_USERNAME, ERR_DB_CURSOR ...
+Result<PasswdLine> ReadPasswdLine(const StoreView &names, std::string_view key);
+Result<PasswdLine> ReadPasswdLine(const TAVOUSERDB &db, std::string_view key);
 
 // Fills a record from the stores name, shadow and misc. ERR_NO_SUCH_USER; codes of TAVOUserAlloc.
-int ReadUser(const AccountSession &session, std::string_view key, TAVOUSER **user);
+Code ReadUser(const AccountSession &session, std::string_view key, TAVOUSER **user);
 
 // The privilege bits of a record, from the stores name and misc. ERR_NO_SUCH_USER.
-int ReadPrivilege(const AccountSession &session, std::string_view key, int32_t &privilege);
+Code ReadPrivilege(const AccountSession &session, std::string_view key, int32_t &privilege);
 
 // The key of the account with this user id: ERR_NO_SUCH_USER when there is none.
-int FindUserKey(const AccountSession &session, int32_t uid, std::string &key);
+Result<std::string> FindUserKey(const AccountSession &session, int32_t uid);
 
 // Fails only when a store cannot be changed; then the stores are no longer to be trusted.
-int StoreUser(const TAVOUSERDB &db, const UserChange &change);
-int RemoveUser(const TAVOUSERDB &db, const std::string &key, int32_t uid);
+Code StoreUser(const TAVOUSERDB &db, const UserChange &change);
+Code RemoveUser(const TAVOUSERDB &db, const std::string &key, int32_t uid);
 
 // "root" and "admin" are never deleted or renamed.
 bool IsReservedKey(std::string_view key);

@@ -22,7 +22,7 @@ UserBatch::Outcome UserBatch::Apply(const char *old_name, const TAVOUSER *user)
     TAVOUSER wanted = *user;
     const std::string home = kHomes + std::string(user->szName);
     if (!old_name) {
-        int code = 0;
+        Code code = 0;
         const bool choose = wanted.nUid == -1;
         if (choose) {
             wanted.nUid = TAVO_USER_UID_MIN;
@@ -41,16 +41,16 @@ UserBatch::Outcome UserBatch::Store(const char *old_name, const TAVOUSER &user, 
 {
     UserChange change;
     const Hashing hashing{::time(nullptr), method_};
-    if (const int code = PrepareUser(db_, old_name, user, hashing, change))
+    if (const Code code = PrepareUser(db_, old_name, user, hashing, change))
         return {.code = code, .absent = old_name && code == ERR_NO_SUCH_USER};
     if (change.key != change.old_key && is_pending_(change.key))
         return {.code = ERR_REMOVE_FAILED};
     if (uid_code != 0)
         return {.code = uid_code};
-    if (const int code = StoreUser(db_, change))
+    if (const Code code = StoreUser(db_, change))
         return {.code = code, .damaged = true};
     if (uid_is_chosen)
-        if (const int code = Btree::Of(db_.pUid)->SetNumber(kCurrentUidKey, change.uid))
+        if (const Code code = Btree::Of(db_.pUid)->SetNumber(kCurrentUidKey, change.uid))
             return {.code = code, .damaged = true};
     done_.push_back({user.szName, change.old_name, change.uid,
                      user.nGid < 0 ? int32_t{TAVO_USER_GID_DEFAULT} : user.nGid, change.new_password, user.szPasswd});

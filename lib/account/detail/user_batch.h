@@ -4,6 +4,7 @@
 
 #include "account/detail/password_hash.h"
 #include "account/detail/user_accounts.h"
+#include "core/detail/result.h"
 
 #include <functional>
 #include <set>
@@ -41,7 +42,7 @@ class UserBatch {
 
     // How an entry came out. A damaged store ends the batch: nothing of it may be kept.
     struct Outcome {
-        int code = 0;
+        Code code = 0;
         bool damaged = false;
         bool duplicate = false;  // the old name was given before
         bool absent = false;     // the old name is not an account

@@ -45,21 +45,22 @@ struct OldUser {
     SmbpasswdLine smb;
 };
 
-int ReadOld(const TAVOUSERDB &db, std::string_view key, OldUser &old)
+Code ReadOld(const TAVOUSERDB &db, std::string_view key, OldUser &old)
 {
-    int code = ReadPasswdLine(db, key, old.passwd);
-    if (code != 0)
-        return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
+    Result<PasswdLine> passwd = ReadPasswdLine(db, key);
+    if (!passwd)
+        return passwd.Failure().Renaming(ERR_KEY_NOT_FOUND, ERR_NO_SUCH_USER);
+    old.passwd = std::move(*passwd);
     old.shadow.hash = "*";
     old.smb.lm_hash = old.smb.nt_hash = kNoSmbHash;
-    if ((code = ReadOptional(*Btree::Of(db.pShadow), key, ParseShadowLine, old.shadow)) != 0)
+    if (const Code code = ReadOptional(*Btree::Of(db.pShadow), key, ParseShadowLine, old.shadow))
         return code;
     return ReadOptional(*Btree::Of(db.pSmb), key, ParseSmbpasswdLine, old.smb);
 }
 
 // A password that is the stored hash stays, with its Samba hashes; any other is clear text.
-int ChoosePassword(const char *password, const OldUser *old, const Hashing &hashing, UserChange &change,
-                   std::string &hash, SmbpasswdLine &smb)
+Code ChoosePassword(const char *password, const OldUser *old, const Hashing &hashing, UserChange &change,
+                    std::string &hash, SmbpasswdLine &smb)
 {
     if (old && old->shadow.hash == password) {
         hash = old->shadow.hash;
@@ -87,25 +88,25 @@ int ChoosePassword(const char *password, const OldUser *old, const Hashing &hash
     return 0;
 }
 
-int FindOld(const TAVOUSERDB &db, const char *old_name, UserChange &change, OldUser &old)
+Code FindOld(const TAVOUSERDB &db, const char *old_name, UserChange &change, OldUser &old)
 {
     const std::optional<std::string> key = AccountKey(old_name);
     if (!key || IsDomainName(old_name))  // a domain's account lives there
         return ERR_NO_SUCH_USER;
-    if (const int code = ReadOld(db, *key, old))
+    if (const Code code = ReadOld(db, *key, old))
         return code;
     change.old_key = *key;
     change.old_name = old.passwd.name;
     change.old_uid = old.passwd.uid;
     change.old_hash = old.shadow.hash;
     change.keep_index = IsReservedKey(*key);
-    return change.keep_index && change.key != *key ? int{ERR_USER_DB_DELETE} : 0;
+    return change.keep_index && change.key != *key ? ERR_USER_DB_DELETE : ERR_SUCCESS;
 }
 
 }  // namespace
 
-int PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user, const Hashing &hashing,
-                UserChange &change)
+Code PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user, const Hashing &hashing,
+                 UserChange &change)
 {
     if (!IsAccountName(user.szName, kUserNameChars) || IsDotName(user.szName))
         return ERR_INVALID_USERNAME;
@@ -118,10 +119,10 @@ int PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user
     change.key = *key;
     OldUser old;
     if (old_name)
-        if (const int code = FindOld(db, old_name, change, old))
+        if (const Code code = FindOld(db, old_name, change, old))
             return code;
     if (change.old_key != change.key)
-        if (const int code = RequireAbsent(*Btree::Of(db.pName), change.key, ERR_USER_EXISTS))
+        if (const Code code = RequireAbsent(*Btree::Of(db.pName), change.key, ERR_USER_EXISTS))
             return code;
 
     const std::string name = user.szName;
@@ -139,7 +140,7 @@ int PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user
     smb.name = name;
     smb.uid = change.uid;
     smb.changed = SmbChangeTime(hashing.now);
-    if (const int code =
+    if (const Code code =
             ChoosePassword(Text(user.szPasswd), old_name ? &old : nullptr, hashing, change, shadow.hash, smb))
         return code;
     change.passwd_line = FormatPasswdLine(passwd);

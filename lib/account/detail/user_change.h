@@ -5,6 +5,7 @@
 #include "tavo_user.h"
 
 #include "account/detail/password_hash.h"
+#include "core/detail/result.h"
 
 #include <ctime>
 #include <string>
@@ -34,8 +35,8 @@ struct Hashing {
 };
 
 // Refuses with one of the codes of TAVOUserSet's entries; changes nothing.
-int PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user, const Hashing &hashing,
-                UserChange &change);
+Code PrepareUser(const TAVOUSERDB &db, const char *old_name, const TAVOUSER &user, const Hashing &hashing,
+                 UserChange &change);
 
 }  // namespace tavo
 

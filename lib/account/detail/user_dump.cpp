@@ -11,49 +11,45 @@
 namespace tavo {
 namespace {
 
-int ParseAccount(std::string_view text, std::string &name, int32_t &id)
+Result<NameAndId> ParseAccount(std::string_view text)
 {
-    PasswdLine line;
-    const int code = ParsePasswdLine(text, line);
-    if (code == 0) {
-        name = std::move(line.name);
-        id = line.uid;
-    }
-    return code;
+    Result<PasswdLine> line = ParsePasswdLine(text);
+    if (!line)
+        return line.Failure();
+    return NameAndId{std::move(line->name), line->uid};
 }
 
 constexpr AccountLines kAccountLines{ParseAccount, kUserTextRows[kPasswdText].path, kUserKeySize};
 
-int WriteLines(TAVOBDB *store, const std::vector<IndexedAccount> &accounts, const char *file, DumpReport &report,
-               std::string &text)
+Code WriteLines(TAVOBDB *store, const std::vector<IndexedAccount> &accounts, const char *file, DumpReport &report,
+                std::string &text)
 {
     for (const IndexedAccount &account : accounts) {
-        std::string_view value;
-        const int code = Btree::Of(store)->Get(account.key, value);
-        if (code == ERR_KEY_NOT_FOUND) {
+        const Result<std::string_view> value = Btree::Of(store)->Get(account.key);
+        if (value.Failure() == ERR_KEY_NOT_FOUND) {
             report.missing.push_back({account.name, file});
             continue;
         }
-        if (code != 0)
-            return code;
-        if (!IsOneLine(LineOf(value)))
+        if (!value)
+            return value.Failure();
+        if (!IsOneLine(LineOf(*value)))
             return ERR_FORMAT_ERROR;
-        text.append(LineOf(value)) += '\n';
+        text.append(LineOf(*value)) += '\n';
     }
     return 0;
 }
 
-int ComposeFiles(const TAVOUSERDB &db, DumpReport &report, std::string (&texts)[kUserTexts])
+Code ComposeFiles(const TAVOUSERDB &db, DumpReport &report, std::string (&texts)[kUserTexts])
 {
     AccountKeys keys;
     std::vector<IndexedAccount> accounts;
-    if (const int code = CollectAccounts(*Btree::Of(db.pUid), *Btree::Of(db.pName), kAccountLines, keys, accounts))
+    if (const Code code = CollectAccounts(*Btree::Of(db.pUid), *Btree::Of(db.pName), kAccountLines, keys, accounts))
         return code;
     report.passwd = ReviewFile(*Btree::Of(db.pName), kAccountLines, keys);
     if (!report.passwd.lost.empty())
         return ERR_WRITE_FAILED;
     int32_t last_uid = TAVO_USER_UID_MIN - 1;
-    if (const int code = ReadLastId(*Btree::Of(db.pUid), kCurrentUidKey, last_uid))
+    if (const Code code = ReadLastId(*Btree::Of(db.pUid), kCurrentUidKey, last_uid))
         return code;
     texts[kMiscText] = FormatMarkerLine(kUidMarker, last_uid) + kMiscComment;
     for (const IndexedAccount &account : accounts)
@@ -63,17 +59,17 @@ int ComposeFiles(const TAVOUSERDB &db, DumpReport &report, std::string (&texts)[
         UserTextIndex text;
     } rows[] = {{db.pSmb, kSmbText}, {db.pShadow, kShadowText}, {db.pMisc, kMiscText}};
     for (const auto &row : rows)
-        if (const int code = WriteLines(row.store, accounts, kUserTextRows[row.text].path, report, texts[row.text]))
+        if (const Code code = WriteLines(row.store, accounts, kUserTextRows[row.text].path, report, texts[row.text]))
             return code;
     return 0;
 }
 
 }  // namespace
 
-int ComposeUsers(const TAVOUSERDB &db, AccountCommit &commit, DumpReport &report)
+Code ComposeUsers(const TAVOUSERDB &db, AccountCommit &commit, DumpReport &report)
 {
     std::string texts[kUserTexts];
-    if (const int code = ComposeFiles(db, report, texts))
+    if (const Code code = ComposeFiles(db, report, texts))
         return code;
     TAVOBDB *const stores[] = {db.pName, db.pMisc, db.pShadow, db.pSmb, db.pUid};
     return WriteFamily(kUserFamily, stores, texts, commit, kAccountFile, report.not_opened);

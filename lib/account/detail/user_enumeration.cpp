@@ -26,7 +26,7 @@ bool IsListed(const PasswdLine &account, bool guest_is_supported)
            (account.uid >= TAVO_USER_UID_MIN && (account.uid != TAVO_USER_UID_GUEST || guest_is_supported));
 }
 
-int AddDomainUsersInUse(const KeyFilter &wanted, std::vector<std::string> &names)
+Code AddDomainUsersInUse(const KeyFilter &wanted, std::vector<std::string> &names)
 {
     ListOwner list(PslTLIBSzListAlloc(1024));
     if (!list)
@@ -53,15 +53,15 @@ bool PushNames(TLIBSZLIST **list, const std::vector<std::string> &names)
     return true;
 }
 
-int ListUsers(int flags, const KeyFilter &wanted, std::vector<std::string> &names)
+Code ListUsers(int flags, const KeyFilter &wanted, std::vector<std::string> &names)
 {
     if ((flags & kAllFlags) == 0)
         return ERR_BAD_PARAMETERS;
     if ((flags & TAVO_USER_DOMAIN_USED) != 0)
-        if (const int code = AddDomainUsersInUse(wanted, names))
+        if (const Code code = AddDomainUsersInUse(wanted, names))
             return code;
     AccountSession session(kUserKind);
-    if (const int code = session.OpenToRead(std::array{size_t{kNameStore}}))
+    if (const Code code = session.OpenToRead(std::array{size_t{kNameStore}}))
         return code;
     const std::optional<bool> guest_is_supported = ReadSetting(kFactorySettings, "supportguest", "yes");
     if (!guest_is_supported)
@@ -69,16 +69,16 @@ int ListUsers(int flags, const KeyFilter &wanted, std::vector<std::string> &name
     StoreView &accounts = *session.View(kNameStore);
     std::string_view key;
     std::string_view value;
-    int code;
+    Code code;
     for (Entry which = Entry::first; (code = accounts.Walk(which, key, value)) == 0; which = Entry::next) {
-        PasswdLine account;
-        if (ParsePasswdLine(value, account) != 0)
+        const Result<PasswdLine> account = ParsePasswdLine(value);
+        if (!account)
             continue;
-        const int kind = IsDomainName(account.name) ? TAVO_USER_DOMAIN : TAVO_USER_LOCAL;
-        if ((flags & kind) != 0 && IsListed(account, *guest_is_supported) && wanted(key.substr(0, key.find('\0'))))
-            names.push_back(account.name);
+        const int kind = IsDomainName(account->name) ? TAVO_USER_DOMAIN : TAVO_USER_LOCAL;
+        if ((flags & kind) != 0 && IsListed(*account, *guest_is_supported) && wanted(key.substr(0, key.find('\0'))))
+            names.push_back(account->name);
     }
-    return code == ERR_DB_END ? 0 : code == ERR_OUT_OF_MEMORY ? code : int{ERR_ENUM_FAILED};
+    return code == ERR_DB_END ? Code() : code == ERR_OUT_OF_MEMORY ? code : Code(ERR_ENUM_FAILED);
 }
 
 }  // namespace tavo

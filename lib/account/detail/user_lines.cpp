@@ -13,25 +13,23 @@
 namespace tavo {
 namespace {
 
-int ReadLines(const AccountSession &session, std::string_view key, UserLines &lines)
+Code ReadLines(const AccountSession &session, std::string_view key, UserLines &lines)
 {
-    PasswdLine account;
-    int code = ReadPasswdLine(*session.View(kNameStore), key, account);
-    std::string_view value;
-    if (code == 0)
-        code = session.View(kShadowStore)->Get(key, value);
-    if (code != 0)
-        return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
-    lines.shadow = LineOf(value);
-    code = session.View(kSmbStore)->Get(key, value);
-    if (code == 0)
-        lines.samba = LineOf(value);
-    return code == ERR_KEY_NOT_FOUND ? 0 : code;
+    if (const Code code = ReadPasswdLine(*session.View(kNameStore), key).Failure())
+        return code.Renaming(ERR_KEY_NOT_FOUND, ERR_NO_SUCH_USER);
+    const Result<std::string_view> shadow = session.View(kShadowStore)->Get(key);
+    if (!shadow)
+        return shadow.Failure().Renaming(ERR_KEY_NOT_FOUND, ERR_NO_SUCH_USER);
+    lines.shadow = LineOf(*shadow);
+    const Result<std::string_view> samba = session.View(kSmbStore)->Get(key);
+    if (samba)
+        lines.samba = LineOf(*samba);
+    return samba.Failure().Renaming(ERR_KEY_NOT_FOUND, ERR_SUCCESS);
 }
 
 }  // namespace
 
-int ChangeUserLines(const char *name, const std::function<int(UserLines &)> &edit, Where where)
+int ChangeUserLines(const char *name, const std::function<Code(UserLines &)> &edit, Where where)
 {
     if (!name)
         return Fail(ERR_BAD_PARAMETERS, where);
@@ -41,11 +39,11 @@ int ChangeUserLines(const char *name, const std::function<int(UserLines &)> &edi
     if (IsDomainName(name))
         return Fail(ERR_NO_SUCH_USER, where);
     AccountTransaction change(kUserKind, where);
-    if (const int code = change.Begin(TAVO_LOCK_USER))
+    if (const Code code = change.Begin(TAVO_LOCK_USER))
         return Fail(code, where);
     AccountSession &session = change.Session();
     UserLines before;
-    int code = ReadLines(session, *key, before);
+    Code code = ReadLines(session, *key, before);
     UserLines lines = before;
     if (code == 0)
         code = edit(lines);

@@ -52,9 +52,10 @@ class UserEntries {
 
 void UserEntries::AddPasswd(std::string_view line)
 {
-    PasswdLine account;
-    if (line.find('\0') != line.npos || ParsePasswdLine(line, account) != 0 || IsDomainName(account.name))
+    const Result<PasswdLine> parsed = ParsePasswdLine(line);
+    if (line.find('\0') != line.npos || !parsed || IsDomainName(parsed->name))
         return;
+    const PasswdLine &account = *parsed;
     const std::optional<std::string> key = FreeKey(stores_[kNameStore], account.name, kUserKeySize);
     if (!key)
         return;

@@ -9,13 +9,13 @@ extern "C" int TAVOGroupAlloc(TAVOGROUP **ppGroup, const char *szLine)
     if (!ppGroup || !szLine)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        tavo::GroupLine line;
-        if (const int code = tavo::ParseGroupLine(szLine, line))
-            return Fail(code);
+        const tavo::Result<tavo::GroupLine> line = tavo::ParseGroupLine(szLine);
+        if (!line)
+            return Fail(line.Failure());
         std::vector<const char *> members;
-        for (const std::string &member : line.members)
+        for (const std::string &member : line->members)
             members.push_back(member.c_str());
         members.push_back(nullptr);
-        return TAVOGroupAlloc2(ppGroup, line.name.c_str(), line.gid, members.data());
+        return TAVOGroupAlloc2(ppGroup, line->name.c_str(), line->gid, members.data());
     });
 }

@@ -29,21 +29,22 @@ bool DeleteOne(const TAVOGROUPDB &db, const char *name, Deleted &deleted)
         LogNotice("%s:%d Duplicate group name:[%s]", name);
         return true;
     }
-    tavo::GroupLine group;
-    int code = key ? tavo::ReadGroupLine(db, *key, group) : int{ERR_NO_SUCH_GROUP};
+    const tavo::Result<tavo::GroupLine> group =
+        key ? tavo::ReadGroupLine(db, *key) : tavo::Result<tavo::GroupLine>(ERR_NO_SUCH_GROUP);
+    int code = group.Failure();
     if (code == ERR_NO_SUCH_GROUP) {
         Fail(code);
         LogError("%s:%d Group [%s] does not exist", name ? name : "");
         return true;
     }
     if (code == 0)
-        code = tavo::RemoveGroup(db, *key, group.gid);
+        code = tavo::RemoveGroup(db, *key, group->gid);
     if (code != 0) {
         Fail(code);
         LogError("%s:%d TAVOGroupDBDelete %s failed. tavoerr=0x%04X", name, code);
         return false;
     }
-    deleted.emplace(*key, group.name);
+    deleted.emplace(*key, group->name);
     return true;
 }
 
@@ -57,7 +58,7 @@ extern "C" int TAVOGroupDelete(const char *const *rgszName, int nGroup)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         tavo::AccountTransaction change(tavo::kGroupKind);
-        if (const int code = change.Begin(kLocksOfDelete))
+        if (const tavo::Code code = change.Begin(kLocksOfDelete))
             return Fail(code);
         Deleted deleted;
         change.Session().BeginChange();
@@ -67,7 +68,7 @@ extern "C" int TAVOGroupDelete(const char *const *rgszName, int nGroup)
         for (const auto &[key, name] : deleted)
             change.Files().Steps().names.push_back(
                 {.is_group = true, .targets = tavo::kShareLists | tavo::kSambaLists, .old_name = name, .new_name = {}});
-        if (const int code = tavo::CommitGroups(change))
+        if (const tavo::Code code = tavo::CommitGroups(change))
             return Fail(code);
         return change.End() ? 0 : Fail(ERR_UNLOCK_FAILED);
     });

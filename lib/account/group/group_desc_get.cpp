@@ -20,16 +20,14 @@ extern "C" int TAVOGroupDescGet(const char *szName, char *szBuf, int cbBuf)
             return Fail(ERR_INVALID_GROUPNAME);
         tavo::AccountSession session(tavo::kGroupKind);
         constexpr std::array stores{size_t{tavo::kGroupNameStore}, size_t{tavo::kDescStore}};
-        if (const int code = session.OpenToRead(stores))
+        if (const tavo::Code code = session.OpenToRead(stores))
             return Fail(code);
-        tavo::GroupLine group;
-        if (const int code = tavo::ReadGroupLine(*session.View(tavo::kGroupNameStore), *key, group))
+        if (const tavo::Code code = tavo::ReadGroupLine(*session.View(tavo::kGroupNameStore), *key).Failure())
             return Fail(code);
-        std::string_view line;
-        const int code = session.View(tavo::kDescStore)->Get(*key, line);
-        if (code != 0 && code != ERR_KEY_NOT_FOUND)
-            return Fail(code);
-        const std::string text(code == 0 ? tavo::GroupDescription(line) : std::string_view());
+        const tavo::Result<std::string_view> line = session.View(tavo::kDescStore)->Get(*key);
+        if (!line && line.Failure() != ERR_KEY_NOT_FOUND)
+            return Fail(line.Failure());
+        const std::string text(line ? tavo::GroupDescription(*line) : std::string_view());
         const size_t length = text.size() + 1;
         if (szBuf && length > static_cast<size_t>(cbBuf))
             return Fail(ERR_NOT_ENOUGH_MEMORY);

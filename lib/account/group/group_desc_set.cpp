@@ -19,15 +19,15 @@ extern "C" int TAVOGroupDescSet(const char *szName, const char *szDesc)
         if (!key)
             return Fail(ERR_INVALID_GROUPNAME);
         tavo::AccountTransaction change(tavo::kGroupKind);
-        if (const int code = change.Begin(TAVO_LOCK_GROUP))
+        if (const tavo::Code code = change.Begin(TAVO_LOCK_GROUP))
             return Fail(code);
         tavo::AccountSession &session = change.Session();
-        tavo::GroupLine group;
-        if (const int code = tavo::ReadGroupLine(tavo::GroupDb(session), *key, group))
-            return Fail(code);
+        const tavo::Result<tavo::GroupLine> group = tavo::ReadGroupLine(tavo::GroupDb(session), *key);
+        if (!group)
+            return Fail(group.Failure());
         session.BeginChange();
         tavo::Btree &descriptions = *session.Store(tavo::kDescStore);
-        int code = *text ? descriptions.Set(*key, tavo::FormatGroupDescLine(group.name, text).append(1, '\0'))
+        int code = *text ? descriptions.Set(*key, tavo::FormatGroupDescLine(group->name, text).append(1, '\0'))
                          : descriptions.Delete(*key);
         if (code == 0 || (code == ERR_KEY_NOT_FOUND && !*text))
             code = tavo::CommitGroups(change);

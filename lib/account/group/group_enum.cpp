@@ -10,7 +10,7 @@ extern "C" int TAVOGroupEnum(TLIBSZLIST **ppList, int flags)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         std::vector<std::string> names;
-        if (const int code = tavo::ListGroups(
+        if (const tavo::Code code = tavo::ListGroups(
                 flags, [](std::string_view) { return true; }, names))
             return Fail(code);
         return tavo::PushNames(ppList, names) ? static_cast<int>(names.size()) : Fail(ERR_OUT_OF_MEMORY);

@@ -14,7 +14,7 @@ extern "C" int TAVOGroupEnumBySubstr(TLIBSZLIST **ppList, int flags, const char 
         const auto wanted = [&](std::string_view key) {
             return text && key.find(*text) != key.npos;
         };
-        if (const int code = tavo::ListGroups(flags, wanted, names))
+        if (const tavo::Code code = tavo::ListGroups(flags, wanted, names))
             return Fail(code);
         return tavo::PushNames(ppList, names) ? static_cast<int>(names.size()) : Fail(ERR_OUT_OF_MEMORY);
     });

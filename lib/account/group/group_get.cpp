@@ -17,11 +17,11 @@ extern "C" int TAVOGroupGet(const char *szName, TAVOGROUP **ppGroup)
         if (!key)
             return Fail(ERR_INVALID_GROUPNAME);
         tavo::AccountSession session(tavo::kGroupKind);
-        if (const int code = session.OpenToRead(std::array{size_t{tavo::kGroupNameStore}}))
+        if (const tavo::Code code = session.OpenToRead(std::array{size_t{tavo::kGroupNameStore}}))
             return Fail(code);
-        std::string_view line;
-        if (const int code = session.View(tavo::kGroupNameStore)->Get(*key, line))
-            return Fail(code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_GROUP} : code);
-        return TAVOGroupAlloc(ppGroup, std::string(line).c_str()) == 0 ? 0 : Fail(tavoerrno);
+        const tavo::Result<std::string_view> line = session.View(tavo::kGroupNameStore)->Get(*key);
+        if (!line)
+            return Fail(line.Failure().Renaming(ERR_KEY_NOT_FOUND, ERR_NO_SUCH_GROUP));
+        return TAVOGroupAlloc(ppGroup, std::string(*line).c_str()) == 0 ? 0 : Fail(tavoerrno);
     });
 }

@@ -15,15 +15,14 @@ extern "C" int TAVOGroupGetByGID(int gid, TAVOGROUP **ppGroup)
     return Guard([&] {
         tavo::AccountSession session(tavo::kGroupKind);
         constexpr std::array stores{size_t{tavo::kGroupNameStore}, size_t{tavo::kGidStore}};
-        if (const int code = session.OpenToRead(stores))
+        if (const tavo::Code code = session.OpenToRead(stores))
             return Fail(code);
-        std::string key;
-        std::string_view line;
-        int code = tavo::FindGroupKey(session, gid, key);
-        if (code == 0)
-            code = session.View(tavo::kGroupNameStore)->Get(key, line);
-        if (code != 0)
-            return Fail(code);
-        return TAVOGroupAlloc(ppGroup, std::string(line).c_str()) == 0 ? 0 : Fail(tavoerrno);
+        const tavo::Result<std::string> key = tavo::FindGroupKey(session, gid);
+        if (!key)
+            return Fail(key.Failure());
+        const tavo::Result<std::string_view> line = session.View(tavo::kGroupNameStore)->Get(*key);
+        if (!line)
+            return Fail(line.Failure());
+        return TAVOGroupAlloc(ppGroup, std::string(*line).c_str()) == 0 ? 0 : Fail(tavoerrno);
     });
 }

@@ -11,23 +11,23 @@
 
 namespace {
 
-int Apply(tavo::AccountTransaction &transaction, const char *old_name, const TAVOGROUP &group,
-          tavo::GroupChange &change)
+tavo::Code Apply(tavo::AccountTransaction &transaction, const char *old_name, const TAVOGROUP &group,
+                 tavo::GroupChange &change)
 {
     const TAVOGROUPDB db = tavo::GroupDb(transaction.Session());
     const bool choose = !old_name && group.nGid == -1;
     int32_t gid = group.nGid;
     if (choose)
-        if (const int code = tavo::FindFreeId(*tavo::Btree::Of(db.pGid), tavo::kGids, gid))
+        if (const tavo::Code code = tavo::FindFreeId(*tavo::Btree::Of(db.pGid), tavo::kGids, gid))
             return code;
-    if (const int code = tavo::PrepareGroup(db, old_name, group, gid, change))
+    if (const tavo::Code code = tavo::PrepareGroup(db, old_name, group, gid, change))
         return code;
     if (change.key != change.old_key && transaction.IsPending(true, change.key))
         return ERR_REMOVE_FAILED;
     transaction.Session().BeginChange();
-    if (const int code = tavo::StoreGroup(db, change))
+    if (const tavo::Code code = tavo::StoreGroup(db, change))
         return code;
-    return choose ? tavo::Btree::Of(db.pGid)->SetNumber(tavo::kCurrentGidKey, gid) : 0;
+    return choose ? tavo::Btree::Of(db.pGid)->SetNumber(tavo::kCurrentGidKey, gid) : tavo::Code();
 }
 
 }  // namespace
@@ -42,7 +42,7 @@ extern "C" int TAVOGroupSet(const char *szOldName, const TAVOGROUP *pGroup)
             return Fail(ERR_INVALID_GROUPNAME);
         }
         tavo::AccountTransaction transaction(tavo::kGroupKind);
-        if (const int code = transaction.Begin(tavo::kAccountLocks))
+        if (const tavo::Code code = transaction.Begin(tavo::kAccountLocks))
             return Fail(code);
         tavo::GroupChange change;
         int code = Apply(transaction, szOldName, *pGroup, change);

@@ -8,7 +8,7 @@ extern "C" int TAVOGroupTotalNum(int flags)
 {
     return Guard([&] {
         std::vector<std::string> names;
-        if (const int code = tavo::ListGroups(
+        if (const tavo::Code code = tavo::ListGroups(
                 flags, [](std::string_view) { return true; }, names))
             return Fail(code);
         return static_cast<int>(names.size());

@@ -15,17 +15,17 @@ extern "C" int TAVOUserModifyGroup(const TLIBSZHASH *pshNames)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         tavo::AccountTransaction change(tavo::kGroupKind);
-        if (const int code = change.Begin(TAVO_LOCK_GROUP))
+        if (const tavo::Code code = change.Begin(TAVO_LOCK_GROUP))
             return Fail(code);
         const auto new_name = [&](const std::string &member) {
             const std::optional<std::string> key = tavo::AccountKey(member);
             return key ? SzTLIBSzHashGetValue(pshNames, key->c_str()) : nullptr;
         };
         bool changed = false;
-        if (const int code = tavo::ChangeMembers(change.Session(), new_name, changed))
+        if (const tavo::Code code = tavo::ChangeMembers(change.Session(), new_name, changed))
             return Fail(code);
         if (changed)
-            if (const int code = tavo::CommitGroups(change))
+            if (const tavo::Code code = tavo::CommitGroups(change))
                 return Fail(code);
         return change.End() ? 0 : Fail(ERR_UNLOCK_FAILED);
     });

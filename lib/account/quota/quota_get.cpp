@@ -17,7 +17,7 @@ extern "C" int TAVOQuotaGet(const char *szUser, const char *szDevice, TAVOQUOTA 
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         int32_t uid = -1;
-        if (const int code = tavo::FindQuotaUser(szUser, uid))
+        if (const tavo::Code code = tavo::FindQuotaUser(szUser, uid))
             return Fail(code);
         dqblk block = {};
         if (::quotactl(QCMD(Q_GETQUOTA, USRQUOTA), szDevice, uid, reinterpret_cast<caddr_t>(&block)) != 0)

@@ -22,7 +22,7 @@ extern "C" int TAVOQuotaInit(int nVolume)
         if (!tavo::IsVolumeMounted(nVolume))
             return Fail(ERR_BAD_PARAMETERS);
         for (const tavo::QuotaCommand &step : kSteps) {
-            if (const int code = tavo::RunQuotaCommand(step, nVolume)) {
+            if (const tavo::Code code = tavo::RunQuotaCommand(step, nVolume)) {
                 LogError("%s:%d Failed to switch quotas on for %s%d, tavoerr=0x%04X", tavo::kVolume, nVolume, code);
                 return Fail(code);
             }

@@ -15,7 +15,7 @@ constexpr double kLargestKb = 18014398509481984.0;  // 2^54: as bytes it still f
 
 static_assert(sizeof(dqblk::dqb_bhardlimit) == 8, "a 32-bit count would end at 4 TiB");
 
-int QuotaCode()
+tavo::Code QuotaCode()
 {
     switch (errno) {
     case ESRCH:
@@ -40,7 +40,7 @@ extern "C" int TAVOQuotaSet(const char *szUser, const char *szDevice, const floa
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         int32_t uid = -1;
-        if (const int code = tavo::FindQuotaUser(szUser, uid))
+        if (const tavo::Code code = tavo::FindQuotaUser(szUser, uid))
             return Fail(code);
         dqblk block = {};
         block.dqb_bhardlimit = block.dqb_bsoftlimit = static_cast<uint64_t>(kb);

@@ -4,8 +4,8 @@
 
 #include "core/detail/fault.h"
 #include "core/detail/setting_switch.h"
+#include "core/detail/strict_number.h"
 
-#include <charconv>
 #include <cstring>
 
 namespace {
@@ -27,10 +27,8 @@ extern "C" int TAVOConfGetUserLimit(void)
         return Fail(ERR_KEY_NOT_FOUND);
     if (text[0] == 0)
         return 0;
-    int limit = 0;
-    const char *end = text + std::strlen(text);
-    const auto [stop, error] = std::from_chars(text, end, limit);
-    if (error != std::errc() || stop != end || limit < 0)
+    const auto limit = tavo::StrictNumber<int>(text);
+    if (!limit || *limit < 0)
         return Fail(ERR_FORMAT_ERROR);
-    return limit - count;
+    return *limit - count;
 }

@@ -32,7 +32,7 @@ extern "C" int TLIBSmbLmHash(const char *szPasswd, unsigned char *rgHash)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         tavo::SecretBytes oem;
-        if (const int code = tavo::UpperCodePage850(szPasswd, oem))
+        if (const tavo::Code code = tavo::UpperCodePage850(szPasswd, oem))
             return Fail(code);
         const tavo::Extras *extras = tavo::LoadExtras();
         if (!extras)

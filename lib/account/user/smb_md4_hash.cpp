@@ -11,7 +11,7 @@ extern "C" int TLIBSmbMd4Hash(const char *szPasswd, unsigned char *rgHash)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         tavo::SecretBytes text;
-        if (const int code = tavo::Utf16LowFirst(szPasswd, text))
+        if (const tavo::Code code = tavo::Utf16LowFirst(szPasswd, text))
             return Fail(code);
         const tavo::Extras *extras = tavo::LoadExtras();
         if (!extras)

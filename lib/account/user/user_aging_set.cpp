@@ -23,8 +23,11 @@ extern "C" int TAVOUserAgingSet(const char *szName, int nMin, int nMax, int nWar
             return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         return tavo::ChangeUserLines(szName, [&](tavo::UserLines &lines) {
-            const std::string old = lines.shadow;
-            return tavo::ReplaceShadowAges(old, {Days(nMin), Days(nMax), Days(nWarn)}, lines.shadow);
+            tavo::Result<std::string> shadow =
+                tavo::ReplaceShadowAges(lines.shadow, {Days(nMin), Days(nMax), Days(nWarn)});
+            if (shadow)
+                lines.shadow = std::move(*shadow);
+            return shadow.Failure();
         });
     });
 }

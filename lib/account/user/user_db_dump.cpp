@@ -78,7 +78,7 @@ extern "C" int TAVOUserDBDump(TAVOUSERDB *pDb)
     return Guard([&] {
         tavo::DumpReport report;
         tavo::Marker earlier;
-        if (const int code = tavo::ResumeCommit(earlier))
+        if (const tavo::Code code = tavo::ResumeCommit(earlier))
             return FailUserDump(code, report);
         tavo::AccountCommit commit(std::move(earlier));
         int code = commit.Samba().Take(kLockSeconds);

@@ -38,8 +38,9 @@ std::vector<Doomed> Collect(const TAVOUSERDB &db, const char *const *names, int 
         }
         if (tavo::IsDomainName(names[i]))
             continue;
-        tavo::PasswdLine account;
-        const int code = key ? tavo::ReadPasswdLine(db, *key, account) : int{ERR_KEY_NOT_FOUND};
+        const tavo::Result<tavo::PasswdLine> account =
+            key ? tavo::ReadPasswdLine(db, *key) : tavo::Result<tavo::PasswdLine>(ERR_KEY_NOT_FOUND);
+        const int code = account.Failure();
         if (code == ERR_KEY_NOT_FOUND) {
             Fail(ERR_NO_SUCH_USER);
             LogError("%s:%d User [%s] does not exist", names[i]);
@@ -49,7 +50,7 @@ std::vector<Doomed> Collect(const TAVOUSERDB &db, const char *const *names, int 
         } else if (!seen.insert(*key).second) {
             LogError("%s:%d Duplicate username:%s", names[i]);
         } else {
-            doomed.push_back({*key, account.name, account.uid});
+            doomed.push_back({*key, account->name, account->uid});
         }
     }
     return doomed;
@@ -108,14 +109,14 @@ extern "C" int TAVOUserDelete(const char *const *rgszName, int nUser)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         tavo::AccountTransaction change(tavo::kUserKind);
-        if (const int code = change.Begin(tavo::kAccountLocks))
+        if (const tavo::Code code = change.Begin(tavo::kAccountLocks))
             return Fail(code);
         TAVOUSERDB db = tavo::UserDb(change.Session());
         const std::vector<Doomed> doomed = Collect(db, rgszName, nUser);
         ClearQuotas(doomed);
         change.Session().BeginChange();
         for (const Doomed &user : doomed) {
-            if (const int code = tavo::RemoveUser(db, user.key, user.uid)) {
+            if (const tavo::Code code = tavo::RemoveUser(db, user.key, user.uid)) {
                 LogError("%s:%d Failed to delete user [%s], tavoerr=0x%04X", user.name, code);
                 return Fail(code);
             }

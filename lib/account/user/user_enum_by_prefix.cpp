@@ -16,7 +16,7 @@ extern "C" int TAVOUserEnumByPrefix(TLIBSZLIST **ppList, int flags, const char *
         const auto wanted = [&](std::string_view key) {
             return upper && key.starts_with(text);
         };
-        if (const int code = tavo::ListUsers(flags, wanted, names))
+        if (const tavo::Code code = tavo::ListUsers(flags, wanted, names))
             return Fail(code);
         return tavo::PushNames(ppList, names) ? static_cast<int>(names.size()) : Fail(ERR_OUT_OF_MEMORY);
     });

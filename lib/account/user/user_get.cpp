@@ -19,7 +19,7 @@ extern "C" int TAVOUserGet(const char *szName, TAVOUSER **ppUser)
             return Fail(ERR_INVALID_USERNAME);
         tavo::AccountSession session(tavo::kUserKind);
         constexpr std::array stores{size_t{tavo::kNameStore}, size_t{tavo::kShadowStore}, size_t{tavo::kMiscStore}};
-        if (const int code = session.OpenToRead(stores))
+        if (const tavo::Code code = session.OpenToRead(stores))
             return Fail(code);
         const int code = tavo::ReadUser(session, *key, ppUser);
         return code == 0 ? 0 : Fail(code);

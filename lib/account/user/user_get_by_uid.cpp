@@ -16,12 +16,10 @@ extern "C" int TAVOUserGetByUID(int uid, TAVOUSER **ppUser)
         tavo::AccountSession session(tavo::kUserKind);
         constexpr std::array stores{size_t{tavo::kNameStore}, size_t{tavo::kShadowStore}, size_t{tavo::kMiscStore},
                                     size_t{tavo::kUidStore}};
-        if (const int code = session.OpenToRead(stores))
+        if (const tavo::Code code = session.OpenToRead(stores))
             return Fail(code);
-        std::string key;
-        int code = tavo::FindUserKey(session, uid, key);
-        if (code == 0)
-            code = tavo::ReadUser(session, key, ppUser);
+        const tavo::Result<std::string> key = tavo::FindUserKey(session, uid);
+        const int code = key ? tavo::ReadUser(session, *key, ppUser) : key.Failure();
         return code == 0 ? 0 : Fail(code);
     });
 }

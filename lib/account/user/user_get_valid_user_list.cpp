@@ -15,15 +15,14 @@ extern "C" int TAVOUserGetValidUserList(const char *const *rgszName, char *szBuf
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         tavo::AccountSession session(tavo::kUserKind);
-        if (const int code = session.OpenToRead(std::array{size_t{tavo::kNameStore}}))
+        if (const tavo::Code code = session.OpenToRead(std::array{size_t{tavo::kNameStore}}))
             return Fail(code);
         std::string valid;
         for (; *rgszName; ++rgszName) {
             const std::optional<std::string> key = tavo::AccountKey(*rgszName);
-            std::string_view line;
             if (!**rgszName || !key)
                 continue;
-            const int code = session.View(tavo::kNameStore)->Get(*key, line);
+            const tavo::Code code = session.View(tavo::kNameStore)->Get(*key).Failure();
             if (code == 0)
                 valid.append(valid.empty() ? "" : ",").append(*rgszName);
             else if (code != ERR_KEY_NOT_FOUND)

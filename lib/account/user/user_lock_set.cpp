@@ -9,19 +9,20 @@
 extern "C" int TAVOUserLockSet(const char *szName, int fLocked)
 {
     return Guard([&] {
-        return tavo::ChangeUserLines(szName, [&](tavo::UserLines &lines) {
-            const std::string old = lines.shadow;
-            if (const int code = tavo::ReplaceShadowLock(old, fLocked != 0, lines.shadow))
-                return code;
+        return tavo::ChangeUserLines(szName, [&](tavo::UserLines &lines) -> tavo::Code {
+            tavo::Result<std::string> shadow = tavo::ReplaceShadowLock(lines.shadow, fLocked != 0);
+            if (!shadow)
+                return shadow.Failure();
+            lines.shadow = std::move(*shadow);
             if (lines.samba.empty())
                 return 0;
-            tavo::SmbpasswdLine samba;
-            if (const int code = tavo::ParseSmbpasswdLine(lines.samba, samba))
-                return code;
-            if (tavo::HasDisabledFlag(samba.flags) == (fLocked != 0))
+            tavo::Result<tavo::SmbpasswdLine> samba = tavo::ParseSmbpasswdLine(lines.samba);
+            if (!samba)
+                return samba.Failure();
+            if (tavo::HasDisabledFlag(samba->flags) == (fLocked != 0))
                 return 0;  // also where there is more in the line than that
-            samba.flags = tavo::WithDisabledFlag(samba.flags, fLocked != 0);
-            lines.samba = tavo::FormatSmbpasswdLine(samba);
+            samba->flags = tavo::WithDisabledFlag(samba->flags, fLocked != 0);
+            lines.samba = tavo::FormatSmbpasswdLine(*samba);
             return 0;
         });
     });

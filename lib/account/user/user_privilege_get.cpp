@@ -18,10 +18,10 @@ extern "C" int TAVOUserPrivilegeGet(const char *szName)
         if (!key)
             return Fail(ERR_INVALID_USERNAME);
         tavo::AccountSession session(tavo::kUserKind);
-        if (const int code = session.OpenToRead(std::array{size_t{tavo::kNameStore}, size_t{tavo::kMiscStore}}))
+        if (const tavo::Code code = session.OpenToRead(std::array{size_t{tavo::kNameStore}, size_t{tavo::kMiscStore}}))
             return Fail(code);
         int32_t privilege = 0;
-        if (const int code = tavo::ReadPrivilege(session, *key, privilege))
+        if (const tavo::Code code = tavo::ReadPrivilege(session, *key, privilege))
             return Fail(code);
         return *key == tavo::WithNul("GUEST") ? 0 : int{privilege};
     });

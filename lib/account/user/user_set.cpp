@@ -80,7 +80,7 @@ extern "C" int TAVOUserSet(const char *const *rgszOldName, const TAVOUSER *const
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         tavo::AccountTransaction change(tavo::kUserKind);
-        if (const int code = change.Begin(tavo::kAccountLocks))
+        if (const tavo::Code code = change.Begin(tavo::kAccountLocks))
             return Fail(code);
         TAVOUSERDB db = tavo::UserDb(change.Session());
         tavo::UserBatch batch(db, [&](const std::string &key) { return change.IsPending(false, key); });

@@ -10,6 +10,7 @@
 #include "account/detail/smbpasswd_line.h"
 #include "account/detail/user_accounts.h"
 #include "account/detail/user_dump.h"
+#include "account/detail/user_lines.h"
 #include "account/detail/user_texts.h"
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
@@ -22,34 +23,30 @@ struct NewHashes {
     const char *nt_hash;
 };
 
-// The two lines with the new hashes, or why not.
-int ReplaceHashes(const TAVOUSERDB &db, std::string_view key, const NewHashes &hashes, std::string &shadow,
-                  std::string &samba)
+// The two lines with the new hashes.
+tavo::Result<tavo::UserLines> ReplaceHashes(const TAVOUSERDB &db, std::string_view key, const NewHashes &hashes)
 {
     if (!tavo::FitsInField(hashes.unix_hash, true) || !tavo::IsSmbHash(hashes.lm_hash) ||
         !tavo::IsSmbHash(hashes.nt_hash))
         return ERR_BAD_PARAMETERS;
-    tavo::PasswdLine account;
-    int code = tavo::ReadPasswdLine(db, key, account);
-    if (code != 0)
-        return code == ERR_KEY_NOT_FOUND ? int{ERR_NO_SUCH_USER} : code;
-    std::string_view line;
-    if ((code = tavo::Btree::Of(db.pShadow)->Get(key, line)) != 0 ||
-        (code = tavo::ReplaceShadowHash(line, hashes.unix_hash, shadow)) != 0)
+    const tavo::Result<tavo::PasswdLine> account = tavo::ReadPasswdLine(db, key);
+    if (!account)
+        return account.Failure().Renaming(ERR_KEY_NOT_FOUND, ERR_NO_SUCH_USER);
+    const tavo::Result<std::string_view> line = tavo::Btree::Of(db.pShadow)->Get(key);
+    if (!line)
+        return line.Failure();
+    tavo::Result<std::string> shadow = tavo::ReplaceShadowHash(*line, hashes.unix_hash);
+    if (!shadow)
+        return shadow.Failure();
+    tavo::SmbpasswdLine samba;  // an account of the system gets its first Samba password
+    samba.name = account->name;
+    samba.uid = account->uid;
+    samba.changed = tavo::SmbChangeTime(::time(nullptr));
+    if (const tavo::Code code = tavo::ReadOptional(*tavo::Btree::Of(db.pSmb), key, tavo::ParseSmbpasswdLine, samba))
         return code;
-    tavo::SmbpasswdLine old;
-    old.name = account.name;
-    old.uid = account.uid;
-    old.changed = tavo::SmbChangeTime(::time(nullptr));
-    code = tavo::Btree::Of(db.pSmb)->Get(key, line);
-    if (code == 0)
-        code = tavo::ParseSmbpasswdLine(line, old);
-    else if (code == ERR_KEY_NOT_FOUND)
-        code = 0;  // an account of the system gets its first Samba password
-    old.lm_hash = hashes.lm_hash;
-    old.nt_hash = hashes.nt_hash;
-    samba = tavo::FormatSmbpasswdLine(old);
-    return code;
+    samba.lm_hash = hashes.lm_hash;
+    samba.nt_hash = hashes.nt_hash;
+    return tavo::UserLines{std::move(*shadow), tavo::FormatSmbpasswdLine(samba)};
 }
 
 struct Outcome {
@@ -64,15 +61,12 @@ Outcome SetHashes(const TAVOUSERDB &db, const char *name, const NewHashes &hashe
         return {ERR_INVALID_USERNAME};
     if (tavo::IsDomainName(name))
         return {ERR_NO_SUCH_USER};  // its password is kept in the domain
-    std::string shadow;
-    std::string samba;
-    if (const int code = ReplaceHashes(db, *key, hashes, shadow, samba))
-        return {code};
-    shadow.push_back('\0');
-    samba.push_back('\0');
-    int code = tavo::Btree::Of(db.pShadow)->Set(*key, shadow);
+    const tavo::Result<tavo::UserLines> lines = ReplaceHashes(db, *key, hashes);
+    if (!lines)
+        return {lines.Failure()};
+    tavo::Code code = tavo::Btree::Of(db.pShadow)->Set(*key, tavo::WithNul(lines->shadow));
     if (code == 0)
-        code = tavo::Btree::Of(db.pSmb)->Set(*key, samba);
+        code = tavo::Btree::Of(db.pSmb)->Set(*key, tavo::WithNul(lines->samba));
     return {code, code != 0};
 }
 
@@ -87,7 +81,7 @@ extern "C" int TAVOUserSetPasswd(const TAVOUSER *const *rgpUser, const char *con
         return 0;
     return Guard([&] {
         tavo::AccountTransaction change(tavo::kUserKind);
-        if (const int code = change.Begin(TAVO_LOCK_USER))
+        if (const tavo::Code code = change.Begin(TAVO_LOCK_USER))
             return Fail(code);
         TAVOUSERDB db = tavo::UserDb(change.Session());
         bool changed = false;

@@ -3,6 +3,8 @@
 #ifndef TAVO_CORE_DETAIL_CHECKED_FORMAT_H
 #define TAVO_CORE_DETAIL_CHECKED_FORMAT_H
 
+#include "core/detail/result.h"
+
 #include <string_view>
 #include <type_traits>
 
@@ -10,9 +12,10 @@ namespace tavo {
 
 enum class ArgKind { text, number };
 
-// Numbers are integers and enumerators; everything else that a format takes is text.
+// Numbers are integers, enumerators and codes; everything else that a format takes is text.
 template <class Arg>
-inline constexpr ArgKind kArgKind = std::is_integral_v<Arg> || std::is_enum_v<Arg> ? ArgKind::number : ArgKind::text;
+inline constexpr ArgKind kArgKind =
+    std::is_integral_v<Arg> || std::is_enum_v<Arg> || std::is_same_v<Arg, Code> ? ArgKind::number : ArgKind::text;
 
 // The compiler names these when a format does not fit: they are not constexpr, so reaching one ends the compilation.
 void FormatHasMoreConversionsThanArguments();

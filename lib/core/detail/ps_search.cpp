@@ -1,8 +1,9 @@
 // Reads the matches of a search for processes.
 #include "core/detail/ps_search.h"
 
+#include "core/detail/strict_number.h"
+
 #include <algorithm>
-#include <charconv>
 #include <cstdlib>
 #include <new>
 
@@ -20,8 +21,8 @@ void PsSearch::Add(std::string_view line)
         return;
     }
     line.remove_prefix(std::min(line.find_first_not_of(" \t"), line.size()));
-    pid_t pid = 0;
-    if (std::from_chars(line.data(), line.data() + line.size(), pid).ec != std::errc() || pid < 1)
+    const auto pid = LeadingNumber<pid_t>(line);
+    if (pid < 1)
         return;
     listed_ = true;
     if (count_ < capacity_)

@@ -4,7 +4,10 @@
 
 #include "tavo_error.h"
 
+#include "core/detail/result.h"
+
 #include <optional>
+#include <type_traits>
 #include <utility>
 
 namespace tavo {
@@ -24,13 +27,18 @@ class [[nodiscard]] Code {
 
 template <class Value>
 class [[nodiscard]] Result {
+    static_assert(!std::is_arithmetic_v<Value>, "a code and a number would be mixed up");
+
   public:
     Result(Value value) : value_(std::move(value)) {}
     Result(Code failure) noexcept : code_(failure) {}
+    Result(decltype(ERR_SUCCESS) failure) noexcept : code_(failure) {}
 
     explicit operator bool() const noexcept { return value_.has_value(); }
     Value &operator*() { return *value_; }
+    const Value &operator*() const { return *value_; }
     Value *operator->() { return &*value_; }
+    const Value *operator->() const { return &*value_; }
     Code Failure() const noexcept { return code_; }  // zero when there is a value
     Result Renaming(int from, int to) && { return value_ ? std::move(*this) : Result(code_.Renaming(from, to)); }
 

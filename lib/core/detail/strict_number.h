@@ -1,4 +1,4 @@
-// Numbers: the whole text or nothing.
+// Numbers in texts.
 #ifndef TAVO_CORE_DETAIL_STRICT_NUMBER_H
 #define TAVO_CORE_DETAIL_STRICT_NUMBER_H
 
@@ -15,6 +15,14 @@ std::optional<Number> StrictNumber(std::string_view text, int base = 10)
     Number number = 0;
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number, base);
     return error == std::errc{} && end == text.data() + text.size() ? std::optional(number) : std::nullopt;
+}
+
+// The number that a text begins with; `otherwise` where there is none or it does not fit.
+template <class Number>
+Number LeadingNumber(std::string_view text, Number otherwise = 0, int base = 10) noexcept
+{
+    std::from_chars(text.data(), text.data() + text.size(), otherwise, base);
+    return otherwise;
 }
 
 }  // namespace tavo

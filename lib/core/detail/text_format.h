@@ -3,6 +3,8 @@
 #ifndef TAVO_CORE_DETAIL_TEXT_FORMAT_H
 #define TAVO_CORE_DETAIL_TEXT_FORMAT_H
 
+#include "core/detail/result.h"
+
 #include <concepts>
 #include <initializer_list>
 #include <string>
@@ -25,9 +27,10 @@ class TextArg {
     {
     }
 
-    template <class Code>
-    requires std::is_enum_v<Code> TextArg(Code code)
-    noexcept : TextArg(static_cast<int>(code)) {}
+    template <class Enum>
+    requires std::is_enum_v<Enum> TextArg(Enum value)
+    noexcept : TextArg(static_cast<int>(value)) {}
+    TextArg(Code code) noexcept : TextArg(static_cast<int>(code)) {}
 
     bool IsText() const noexcept { return kind_ == Kind::text; }
     std::string_view Text() const noexcept { return text_; }

@@ -1,12 +1,12 @@
 // The record of an interface, read from its file and from the kernel.
 #include "network/detail/card_record.h"
 
+#include "core/detail/strict_number.h"
 #include "network/detail/interface_file.h"
 #include "network/detail/kernel_interface.h"
 #include "network/detail/net_buffer.h"
 
 #include <cerrno>
-#include <charconv>
 #include <cstring>
 
 namespace tavo {
@@ -17,13 +17,6 @@ void Put(char (&field)[Size], std::string_view text)
 {
     if (!ToBuffer(text, field, Size))
         field[0] = 0;
-}
-
-int Number(const std::string &text)
-{
-    int value = 0;
-    std::from_chars(text.data(), text.data() + text.size(), value);
-    return value;
 }
 
 void PutAddress(TAVONETCARD &card, const InterfaceAddress &found)
@@ -57,7 +50,7 @@ CardState ReadCard(const std::string &interface, TAVONETCARD *card)
     card->nMode = ReadSetting(InterfaceFile(interface), "BOOTPROTO") == "dhcp" ? TAVO_NET_DHCP : TAVO_NET_STATIC;
     Put(card->szGateway, ReadSetting(kNetworkFile, "GATEWAY"));
     Put(card->szMac, InterfaceAttribute(interface, "address"));
-    card->nMtu = Number(InterfaceAttribute(interface, "mtu"));
+    card->nMtu = LeadingNumber<int>(InterfaceAttribute(interface, "mtu"));
     card->fLink = InterfaceAttribute(interface, "carrier") == "1";
     if (const auto found = AddressOf(interface)) {
         PutAddress(*card, *found);

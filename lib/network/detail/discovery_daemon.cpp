@@ -4,12 +4,12 @@
 #include "tavo_proc.h"
 
 #include "core/detail/open_file.h"
+#include "core/detail/strict_number.h"
 #include "core/detail/text_fields.h"
 #include "network/detail/host_list.h"
 #include "network/detail/kernel_interface.h"
 
 #include <cerrno>
-#include <charconv>
 #include <cstdio>
 #include <cstdlib>
 #include <string>
@@ -20,14 +20,6 @@ namespace {
 constexpr const char *kDaemon = "/usr/tavo/bin/findhostd";
 constexpr const char *kPidFile = "/var/run/findhostd.pid";
 constexpr unsigned kStartSeconds = 3;
-
-template <class Number>
-Number ToNumber(std::string_view text)
-{
-    Number number = 0;
-    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
-    return error == std::errc() && end == text.data() + text.size() ? number : 0;
-}
 
 bool IsRoots(pid_t pid)
 {
@@ -65,7 +57,8 @@ bool IsDiscoveryAlive()
         if (field.size() < 6 || field[1] != "FLOCK" || field[3] != "WRITE")
             continue;
         const std::string_view inode = field[5].substr(field[5].rfind(':') + 1);
-        if (ToNumber<unsigned long long>(inode) == st.st_ino && IsRoots(ToNumber<pid_t>(field[4])))
+        if (StrictNumber<unsigned long long>(inode).value_or(0) == st.st_ino &&
+            IsRoots(StrictNumber<pid_t>(field[4]).value_or(0)))
             return true;
     }
     return false;

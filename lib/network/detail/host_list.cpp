@@ -1,12 +1,12 @@
 // One line of the list of discovered hosts.
 #include "network/detail/host_list.h"
 
+#include "core/detail/strict_number.h"
 #include "core/detail/text_fields.h"
 #include "network/detail/ipv4_text.h"
 #include "network/detail/net_buffer.h"
 
 #include <array>
-#include <charconv>
 
 namespace tavo {
 namespace {
@@ -14,14 +14,6 @@ namespace {
 constexpr size_t kFields = 5;
 constexpr long kLeastProtocol = 240;
 constexpr size_t kLongestName = 255;
-
-// The number at the beginning of the field; 0 when there is none.
-long LeadingNumber(std::string_view field) noexcept
-{
-    long number = 0;
-    std::from_chars(field.data(), field.data() + field.size(), number);
-    return number;
-}
 
 using Fields = std::array<std::string_view, kFields>;
 
@@ -43,9 +35,9 @@ HostLine ParseHostLine(std::string_view line) noexcept
     Fields field;
     if (!Split(line, field))
         return {HostLineKind::too_few_fields, {}, {}};
-    if (LeadingNumber(field[0]) == 0)
+    if (LeadingNumber<long>(field[0]) == 0)
         return {HostLineKind::no_model, {}, {}};
-    if (LeadingNumber(field[1]) < kLeastProtocol)
+    if (LeadingNumber<long>(field[1]) < kLeastProtocol)
         return {HostLineKind::other_protocol, {}, {}};
     if (!ParseIpv4(field[3]))
         return {HostLineKind::bad_address, {}, {}};
@@ -58,8 +50,8 @@ std::optional<TAVOFHOST> ParseHost(std::string_view line) noexcept
     if (ParseHostLine(line).kind != HostLineKind::host || !Split(line, field))
         return std::nullopt;
     TAVOFHOST host = {};
-    host.nModel = static_cast<uint32_t>(LeadingNumber(field[0]));
-    host.nProtocol = static_cast<uint32_t>(LeadingNumber(field[1]));
+    host.nModel = static_cast<uint32_t>(LeadingNumber<long>(field[0]));
+    host.nProtocol = static_cast<uint32_t>(LeadingNumber<long>(field[1]));
     if (field[2].empty() || !ToBuffer(field[2], host.szName, sizeof host.szName) ||
         !ToBuffer(field[3], host.szIp, sizeof host.szIp) ||
         !ToBuffer(field[4], host.szInterface, sizeof host.szInterface))

@@ -1,12 +1,12 @@
 // What the kernel has for one interface.
 #include "network/detail/live_card.h"
 
+#include "core/detail/strict_number.h"
 #include "network/detail/connected_route.h"
 #include "network/detail/dhcp_client.h"
 #include "network/detail/ipv6_text.h"
 #include "network/detail/wake_on_lan.h"
 
-#include <charconv>
 #include <cstring>
 
 #include <arpa/inet.h>
@@ -28,10 +28,8 @@ Ipv4 AddressIn(const sockaddr *address)
 bool IsUp(const std::string &interface)
 {
     const std::string flags = InterfaceAttribute(interface, "flags");
-    unsigned value = 0;
-    const size_t start = flags.starts_with("0x") ? 2 : 0;
-    std::from_chars(flags.data() + start, flags.data() + flags.size(), value, 16);
-    return (value & IFF_UP) != 0;
+    const std::string_view digits = std::string_view(flags).substr(flags.starts_with("0x") ? 2 : 0);
+    return (LeadingNumber(digits, 0u, 16) & IFF_UP) != 0;
 }
 
 std::vector<InterfaceAddress> LiveAddresses(const std::string &interface)

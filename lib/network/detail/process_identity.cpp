@@ -2,11 +2,11 @@
 #include "network/detail/process_identity.h"
 
 #include "core/detail/process_list.h"
+#include "core/detail/strict_number.h"
 #include "core/detail/text_fields.h"
 #include "network/detail/kernel_interface.h"
 
 #include <algorithm>
-#include <charconv>
 #include <csignal>
 
 #include <unistd.h>
@@ -52,9 +52,7 @@ void EndProcess(pid_t pid, std::string_view beginning)
 
 pid_t ToPid(std::string_view text)
 {
-    pid_t pid = 0;
-    std::from_chars(text.data(), text.data() + text.size(), pid);
-    return pid;
+    return LeadingNumber<pid_t>(text);
 }
 
 }  // namespace tavo

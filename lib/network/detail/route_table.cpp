@@ -1,9 +1,8 @@
 // The kernel's IPv4 routes, as /proc/net/route lists them.
 #include "network/detail/route_table.h"
 
+#include "core/detail/strict_number.h"
 #include "core/detail/text_fields.h"
-
-#include <charconv>
 
 #include <arpa/inet.h>
 #include <net/route.h>
@@ -15,19 +14,10 @@ constexpr std::string_view kHeader[] = {"Iface",  "Destination", "Gateway", "Fla
                                         "Metric", "Mask",        "MTU",     "Window", "IRTT"};
 constexpr size_t kFields = std::size(kHeader);
 
-std::optional<uint32_t> ReadNumber(std::string_view text, int base)
-{
-    uint32_t value = 0;
-    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value, base);
-    if (error != std::errc() || end != text.data() + text.size())
-        return std::nullopt;
-    return value;
-}
-
 // The table shows an address as the word that it is in memory: first octet lowest on the processors that we run on.
 std::optional<Ipv4> ReadAddress(std::string_view text)
 {
-    const auto word = ReadNumber(text, 16);
+    const auto word = StrictNumber<uint32_t>(text, 16);
     if (!word)
         return std::nullopt;
     return Ipv4::FromWord(ntohl(*word));
@@ -53,8 +43,8 @@ std::optional<std::vector<Route>> ParseRouteTable(std::string_view text)
             continue;
         const auto destination = ReadAddress(field[1]);
         const auto gateway = ReadAddress(field[2]);
-        const auto flags = ReadNumber(field[3], 16);
-        const auto metric = ReadNumber(field[6], 10);
+        const auto flags = StrictNumber<uint32_t>(field[3], 16);
+        const auto metric = StrictNumber<uint32_t>(field[6], 10);
         const auto mask = ReadAddress(field[7]);
         if (destination && gateway && flags && metric && mask)
             routes.push_back({std::string(field[0]), *destination, *gateway, *mask, *flags, *metric});

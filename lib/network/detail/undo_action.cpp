@@ -9,6 +9,7 @@
 #include "core/detail/lock_hold.h"
 #include "core/detail/process_list.h"
 #include "core/detail/run_command.h"
+#include "core/detail/strict_number.h"
 #include "core/detail/text_fields.h"
 #include "network/detail/connected_route.h"
 #include "network/detail/dhcp_client.h"
@@ -19,7 +20,6 @@
 #include "network/detail/wake_on_lan.h"
 
 #include <algorithm>
-#include <charconv>
 
 #include <unistd.h>
 
@@ -86,15 +86,12 @@ void RemoveOtherSettings(const UndoStep &step)
 
 mode_t ToMode(const std::string &text)
 {
-    mode_t mode = 0644;
-    std::from_chars(text.data(), text.data() + text.size(), mode, 8);
-    return mode;
+    return LeadingNumber<mode_t>(text, 0644, 8);
 }
 
 void TellCard(const UndoStep &step)
 {
-    uint32_t bits = 0;
-    std::from_chars(step.value.data(), step.value.data() + step.value.size(), bits);
+    const auto bits = LeadingNumber<uint32_t>(step.value);
     const auto now = GetWakeSettings(step.target.c_str());
     if (now && now->enabled != bits)
         SetWakeOptions(step.target.c_str(), bits);

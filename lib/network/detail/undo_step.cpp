@@ -1,9 +1,8 @@
 // The steps that restore parts of the network, as data.
 #include "network/detail/undo_step.h"
 
+#include "core/detail/strict_number.h"
 #include "core/detail/text_fields.h"
-
-#include <charconv>
 
 namespace tavo {
 namespace {
@@ -11,18 +10,9 @@ namespace {
 constexpr std::string_view kUndoEnd = "end\n";  // of a record that was written to its end
 constexpr std::string_view kUndoKinds = "fFosSOhcarewdnk";
 
-std::optional<size_t> ReadLength(std::string_view text)
-{
-    size_t length = 0;
-    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), length);
-    if (error != std::errc() || end != text.data() + text.size())
-        return std::nullopt;
-    return length;
-}
-
 bool TakePart(std::string_view &text, std::string_view length, std::string &part)
 {
-    const auto size = ReadLength(length);
+    const auto size = StrictNumber<size_t>(length);
     if (!size || *size > text.size())
         return false;
     part = text.substr(0, *size);

@@ -39,7 +39,7 @@ extern "C" int TAVOFHOSTGet2Hash(TLIBSZHASH **ppshHosts)
     return Guard([&] {
         const tavo::Fd list = tavo::OpenHostList(tavo::kHostListTaken);
         if (!list)
-            return static_cast<int>(FailZero(ERR_OPEN_FAILED));
+            return FailNone(ERR_OPEN_FAILED);
         const DeleteList always;
 
         tavo::LineReader reader(list.Get());

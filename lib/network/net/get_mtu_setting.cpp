@@ -2,9 +2,9 @@
 #include "tavo_net.h"
 
 #include "core/detail/fault.h"
+#include "core/detail/strict_number.h"
 #include "network/detail/mtu_setting.h"
 
-#include <charconv>
 #include <cstring>
 
 extern "C" int TAVOGetMTUSetting(const char *szInterface)
@@ -12,10 +12,6 @@ extern "C" int TAVOGetMTUSetting(const char *szInterface)
     char text[16];
     if (TAVOConfGetMTUValue(szInterface, text, sizeof text) != 0)
         return -1;
-    int mtu = 0;
-    const char *const end = text + std::strlen(text);
-    const auto [next, error] = std::from_chars(text, end, mtu);
-    if (error != std::errc() || next != end || !tavo::IsMtu(mtu))
-        return Fail(ERR_FORMAT_ERROR);
-    return mtu;
+    const auto mtu = tavo::StrictNumber<int>(text);
+    return mtu && tavo::IsMtu(*mtu) ? *mtu : Fail(ERR_FORMAT_ERROR);
 }

@@ -49,7 +49,7 @@ bool LooksLikeTable(const BootSector &sector)
 
 }  // namespace
 
-int ReadBootSector(const char *path, BootSector &sector)
+Code ReadBootSector(const char *path, BootSector &sector)
 {
     const Fd fd = OpenFd(path, O_RDONLY);
     if (!fd)

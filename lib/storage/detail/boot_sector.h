@@ -2,6 +2,8 @@
 #ifndef TAVO_STORAGE_DETAIL_BOOT_SECTOR_H
 #define TAVO_STORAGE_DETAIL_BOOT_SECTOR_H
 
+#include "core/detail/result.h"
+
 #include <array>
 #include <cstddef>
 #include <cstdint>
@@ -12,7 +14,7 @@ inline constexpr size_t kSectorBytes = 512;
 using BootSector = std::array<unsigned char, kSectorBytes>;
 
 // Reads it: 0, or ERR_OPEN_FAILED or ERR_READ_FAILED.
-int ReadBootSector(const char *path, BootSector &sector);
+Code ReadBootSector(const char *path, BootSector &sector);
 
 bool HasTableSignature(const BootSector &sector);
 

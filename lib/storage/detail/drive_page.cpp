@@ -1,7 +1,8 @@
 // The 512-byte pages that a drive answers with.
 #include "storage/detail/drive_page.h"
 
-#include <charconv>
+#include "core/detail/strict_number.h"
+
 #include <numeric>
 
 namespace tavo {
@@ -53,9 +54,7 @@ std::optional<int> SmartTemperature(const DrivePage &page)
     const std::optional<uint64_t> raw = SmartRawValue(page, kTemperature);
     if (!raw)
         return std::nullopt;
-    const std::string text = TemperatureText(*raw);
-    int degrees = 0;
-    std::from_chars(text.data(), text.data() + text.size(), degrees);
+    const int degrees = LeadingNumber<int>(TemperatureText(*raw));
     return degrees >= kColdest && degrees <= kHottest ? std::optional(degrees) : std::nullopt;
 }
 

@@ -3,8 +3,9 @@
 
 #include "tavo_error.h"
 
+#include "core/detail/strict_number.h"
+
 #include <algorithm>
-#include <charconv>
 
 namespace tavo {
 namespace {
@@ -33,9 +34,9 @@ std::string_view TakeField(std::string_view &line)
 template <class Number>
 bool TakeNumber(std::string_view &line, Number &number)
 {
-    const std::string_view field = TakeField(line);
-    const auto [end, error] = std::from_chars(field.data(), field.data() + field.size(), number);
-    return !field.empty() && error == std::errc{} && end == field.data() + field.size();
+    const auto read = StrictNumber<Number>(TakeField(line));
+    number = read.value_or(0);
+    return read.has_value();
 }
 
 }  // namespace
@@ -71,7 +72,7 @@ bool PartitionsFile::NextRow(PartitionsRow &row)
     return false;
 }
 
-int PartitionsFile::Code() const
+Code PartitionsFile::Failure() const
 {
     if (!fd_)
         return ERR_OPEN_FAILED;

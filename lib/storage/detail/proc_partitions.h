@@ -4,6 +4,7 @@
 
 #include "core/detail/line_reader.h"
 #include "core/detail/open_file.h"
+#include "core/detail/result.h"
 
 #include <cstdint>
 #include <optional>
@@ -33,7 +34,7 @@ class PartitionsFile {
     bool NextRow(PartitionsRow &row);
 
     // After the last line: 0, or the code of what went wrong.
-    int Code() const;
+    Code Failure() const;
 
   private:
     Fd fd_ = OpenFd("/proc/partitions", O_RDONLY);

@@ -44,7 +44,7 @@ bool ReadLinkText(const std::string &path, std::string &text)
 
 }  // namespace
 
-int OpenRawDisk(const char *path, Fd &fd)
+Code OpenRawDisk(const char *path, Fd &fd)
 {
     fd = OpenFd(path, O_RDONLY);
     if (!fd)
@@ -52,7 +52,7 @@ int OpenRawDisk(const char *path, Fd &fd)
     struct stat facts;
     if (::fstat(fd.Get(), &facts) != 0)
         return ERR_STAT_FAILED;
-    return S_ISBLK(facts.st_mode) && IsDiskMajor(major(facts.st_rdev)) ? 0 : int{ERR_NOT_A_DISK};
+    return S_ISBLK(facts.st_mode) && IsDiskMajor(major(facts.st_rdev)) ? Code() : Code(ERR_NOT_A_DISK);
 }
 
 int HangsOnMarvell(const char *path, std::string &unreadable)
@@ -76,7 +76,7 @@ int HangsOnMarvell(const char *path, std::string &unreadable)
     return line == "0x7042\n" || line == "0x6145\n" ? 1 : 0;
 }
 
-int RawDisk::Open(const char *path)
+Code RawDisk::Open(const char *path)
 {
     const int code = OpenRawDisk(path, fd_);
     if (code == 0)

@@ -3,6 +3,7 @@
 #define TAVO_STORAGE_DETAIL_RAW_DISK_H
 
 #include "core/detail/owner.h"
+#include "core/detail/result.h"
 #include "storage/detail/drive_page.h"
 
 #include <cstdint>
@@ -12,7 +13,7 @@ namespace tavo {
 
 // Read-only and non-blocking; only what has a disk's major number, so that no other device gets a drive's commands.
 // 0, ERR_OPEN_RAWDEVICE, ERR_STAT_FAILED or ERR_NOT_A_DISK.
-int OpenRawDisk(const char *path, Fd &fd);
+Code OpenRawDisk(const char *path, Fd &fd);
 
 // Returns whether the disk's controller is that of the system-on-chip: 1 or 0; -1 with the path that cannot be read.
 int HangsOnMarvell(const char *path, std::string &unreadable);
@@ -20,7 +21,7 @@ int HangsOnMarvell(const char *path, std::string &unreadable);
 class RawDisk {
   public:
     // 0, or a code of OpenRawDisk.
-    int Open(const char *path);
+    Code Open(const char *path);
 
     // Takes any device that opens, for data that is only read. False with errno.
     bool OpenToRead(const char *path);

@@ -3,6 +3,7 @@
 #define TAVO_STORAGE_DETAIL_RAW_DISK_REPORT_H
 
 #include "core/detail/guard.h"
+#include "core/detail/result.h"
 #include "storage/detail/raw_disk.h"
 
 namespace tavo {
@@ -13,7 +14,7 @@ int WithRawDisk(const char *path, Body &&body, Where where = Where())
 {
     const auto open_first = [&]() -> int {
         RawDisk disk;
-        if (const int code = disk.Open(path))
+        if (const Code code = disk.Open(path))
             return Fail(code, where);
         return body(disk);
     };

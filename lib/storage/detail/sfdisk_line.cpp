@@ -1,9 +1,8 @@
 // A line of the appliance's sfdisk.
 #include "storage/detail/sfdisk_line.h"
 
+#include "core/detail/strict_number.h"
 #include "core/detail/text_fields.h"
-
-#include <charconv>
 
 namespace tavo {
 namespace {
@@ -13,8 +12,9 @@ constexpr size_t kReadable = 63;  // only so much of a line has ever been read; 
 template <class Number>
 bool ParseField(std::string_view field, Number &number, int base)
 {
-    const auto [end, error] = std::from_chars(field.data(), field.data() + field.size(), number, base);
-    return error == std::errc{} && end == field.data() + field.size();
+    const auto read = StrictNumber<Number>(field, base);
+    number = read.value_or(0);
+    return read.has_value();
 }
 
 }  // namespace

@@ -3,8 +3,8 @@
 
 #include "core/detail/line_reader.h"
 #include "core/detail/open_file.h"
+#include "core/detail/strict_number.h"
 
-#include <charconv>
 #include <string>
 
 namespace tavo {
@@ -26,10 +26,7 @@ std::optional<unsigned> ReadUsbId(const std::string &path)
 std::optional<unsigned> ParseUsbId(std::string_view text)
 {
     text = WithoutNewline(text);
-    unsigned id = 0;
-    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), id, 16);
-    const bool whole = text.size() == 4 && error == std::errc{} && end == text.data() + text.size();
-    return whole ? std::optional(id) : std::nullopt;
+    return text.size() == 4 ? StrictNumber<unsigned>(text, 16) : std::nullopt;
 }
 
 std::optional<UsbId> UsbIdOfDisk(std::string_view name)

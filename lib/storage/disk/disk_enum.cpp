@@ -21,7 +21,7 @@ extern "C" int TAVODiskEnum(int nKind, int32_t **ppNumber)
             else if (row.IsWholeScsiDisk())
                 scsi.push_back(row.DeviceNumber());
         }
-        if (const int code = file.Code())
+        if (const tavo::Code code = file.Failure())
             return Fail(code);
         const size_t count = ide.size() + scsi.size();
         int32_t *numbers = nullptr;

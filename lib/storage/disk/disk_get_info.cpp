@@ -13,8 +13,8 @@ namespace {
 
 constexpr int32_t kDiskKind = 7;
 
-// The kernel name; empty with the code when there is no such disk.
-std::string FindDisk(int number, int &code)
+// The kernel name.
+tavo::Result<std::string> FindDisk(int number)
 {
     tavo::PartitionsFile file;
     for (tavo::PartitionsRow row; file.NextRow(row);) {
@@ -22,8 +22,7 @@ std::string FindDisk(int number, int &code)
         if (whole && row.DeviceNumber() == number && tavo::IsDeviceName(row.name))
             return std::string(row.name);
     }
-    code = file.Code() ? file.Code() : int{ERR_NO_DISK_ID};
-    return {};
+    return file.Failure() ? file.Failure() : tavo::Code(ERR_NO_DISK_ID);
 }
 
 }  // namespace
@@ -33,19 +32,18 @@ extern "C" int TAVODiskGetInfo(int nKind, int nDevice, TAVODISKINFO **ppInfo)
     if (nKind != 1 || !ppInfo)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
-        int code = 0;
-        const std::string name = FindDisk(nDevice, code);
-        if (name.empty())
-            return Fail(code);
+        const tavo::Result<std::string> name = FindDisk(nDevice);
+        if (!name)
+            return Fail(name.Failure());
         uint64_t bytes = 0;
-        const tavo::Fd disk = tavo::OpenFd(("/dev/" + name).c_str(), O_RDONLY);
+        const tavo::Fd disk = tavo::OpenFd(("/dev/" + *name).c_str(), O_RDONLY);
         if (!disk || !tavo::AskSize(disk, bytes))
             return Fail(ERR_DISK_IO_FAILED);
         tavo::HeapBlock<TAVODISKINFO> info(static_cast<TAVODISKINFO *>(std::calloc(1, sizeof(TAVODISKINFO))));
         if (!info)
             return Fail(ERR_NOT_ENOUGH_MEMORY);
         info->nDevice = nDevice;
-        name.copy(info->szName, sizeof info->szName - 1);
+        name->copy(info->szName, sizeof info->szName - 1);
         info->nKind = kDiskKind;
         info->cMibDisk = bytes >> 20;
         *ppInfo = info.Release();

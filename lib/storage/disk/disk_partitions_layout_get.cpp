@@ -5,10 +5,10 @@
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
 #include "core/detail/model_setting.h"
+#include "core/detail/strict_number.h"
 #include "storage/detail/device_name.h"
 #include "storage/detail/proc_partitions.h"
 
-#include <charconv>
 #include <optional>
 #include <string>
 
@@ -31,10 +31,8 @@ std::optional<int> EntryOf(std::string_view name, std::string_view disk)
     const std::string_view rest = name.substr(disk.size());
     if (rest.empty())
         return 0;
-    int number = 0;
-    const auto [end, error] = std::from_chars(rest.data(), rest.data() + rest.size(), number);
-    const bool whole = rest[0] != '0' && error == std::errc{} && end == rest.data() + rest.size();
-    return whole && number >= 1 && number < DISK_LAYOUT_ENTRIES ? std::optional(number) : std::nullopt;
+    const auto number = tavo::StrictNumber<int>(rest);
+    return rest[0] != '0' && number && *number >= 1 && *number < DISK_LAYOUT_ENTRIES ? number : std::nullopt;
 }
 
 void FillEntry(TavoPartitionEntry &entry, int number, std::string_view disk, const tavo::PartitionsRow &row)
@@ -86,7 +84,7 @@ extern "C" int DiskPartitionsLayoutGet(const char *szName, TavoPartitionLayout *
             FillEntry(pLayout->rgEntry[*number], *number, disk, row);
             ++pLayout->nEntry;
         }
-        if (const int code = file.Code()) {
+        if (const tavo::Code code = file.Failure()) {
             LogError("%s:%d Failed to read line of /proc/partitions, errno=0x%X", code);
             return Fail(code);
         }

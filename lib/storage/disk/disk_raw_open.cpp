@@ -9,7 +9,7 @@ extern "C" int TAVOIDiskRawOpen(const char *szPath)
     if (!szPath)
         return Fail(ERR_BAD_PARAMETERS);
     tavo::Fd disk;
-    if (const int code = tavo::OpenRawDisk(szPath, disk))
+    if (const tavo::Code code = tavo::OpenRawDisk(szPath, disk))
         return Fail(code);
     return disk.Release();
 }

@@ -9,11 +9,11 @@
 extern "C" int TAVODiskWriteCacheGet(const char *szPath)
 {
     if (!szPath)
-        return static_cast<int>(FailZero(ERR_BAD_PARAMETERS));
+        return FailNone(ERR_BAD_PARAMETERS);
     return Guard([&] {
         tavo::RawDisk disk;
-        if (const int code = disk.Open(szPath))
-            return static_cast<int>(FailZero(code));
+        if (const tavo::Code code = disk.Open(szPath))
+            return FailNone(code);
         if (disk.IsMarvell()) {
             const auto page = tavo::ReadCachingPage(disk.Descriptor());
             return page && page->IsOn() ? 1 : 0;

@@ -51,7 +51,7 @@ extern "C" int PartitionPathEnum(const PARTITIONFILTER *pFilter, TLIBSZLIST **pp
             if (TLIBSzListPush(ppList, std::string(tavo::kDev).append(row->name).c_str()) < 0)
                 return -1;
         }
-        if (file.Code() != 0 || !any) {
+        if (file.Failure() != 0 || !any) {
             LogError("%s:%d There's no line in /proc/partitions");
             return -1;
         }

@@ -11,7 +11,7 @@ extern "C" int PartitionTableTypeGet(const char *szPath, int *pKind)
         return -1;
     }
     tavo::BootSector sector;
-    if (const int code = tavo::ReadBootSector(szPath, sector)) {
+    if (const tavo::Code code = tavo::ReadBootSector(szPath, sector)) {
         LogError("%s:%d TAVOReadOneSectorFromDev failed. szDevPath=[%s], errno=[0x%04X]", szPath, code);
         return -1;
     }

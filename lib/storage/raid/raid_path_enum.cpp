@@ -21,7 +21,7 @@ class Arrays {
     Arrays &operator=(const Arrays &) = delete;
 
     // 0, or the code of what went wrong.
-    int Code() const
+    int Failure() const
     {
         return error_ == 0 || error_ == GLOB_NOMATCH ? 0 : error_ == GLOB_NOSPACE ? ERR_OUT_OF_MEMORY : ERR_OPEN_FAILED;
     }
@@ -55,8 +55,8 @@ extern "C" int RAIDPathEnum(TLIBSZLIST **ppList)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         const Arrays arrays;
-        if (arrays.Code() != 0)
-            return Fail(arrays.Code());
+        if (arrays.Failure() != 0)
+            return Fail(arrays.Failure());
         const std::vector<int> numbers = arrays.Numbers();
         for (const int number : numbers) {
             if (TLIBSzListPush(ppList, (std::string(tavo::kArray) + std::to_string(number)).c_str()) < 0)

@@ -25,10 +25,10 @@ TEST(PasswdLine, ReadsWhatItWrites)
     const tavo::PasswdLine line{"Bob", 1030, 100, "a:b, c%3A", "/home/bob", "/bin/sh"};
     const std::string text = tavo::FormatPasswdLine(line);
     EXPECT_EQ(text, "Bob:x:1030:100:a%3Ab, c%253A:/home/bob:/bin/sh");
-    tavo::PasswdLine read;
-    ASSERT_EQ(tavo::ParsePasswdLine(text + '\0', read), 0);
-    EXPECT_EQ(read.description, line.description);
-    EXPECT_EQ(tavo::FormatPasswdLine(read), text);
+    const auto read = tavo::ParsePasswdLine(text + '\0');
+    ASSERT_TRUE(read);
+    EXPECT_EQ(read->description, line.description);
+    EXPECT_EQ(tavo::FormatPasswdLine(*read), text);
 
     const struct {
         const char *text;
@@ -45,7 +45,7 @@ TEST(PasswdLine, ReadsWhatItWrites)
         {"", ERR_FORMAT_ERROR},
     };
     for (const auto &row : rows)
-        EXPECT_EQ(tavo::ParsePasswdLine(row.text, read), row.code) << row.text;
+        EXPECT_EQ(tavo::ParsePasswdLine(row.text).Failure(), row.code) << row.text;
 }
 
 TEST(ShadowLine, AgesCarryTheFlag)
@@ -67,17 +67,15 @@ TEST(ShadowLine, AgesCarryTheFlag)
         {"a:h:1:0:99999:7::::", ERR_FORMAT_ERROR, false, 0},
     };
     for (const auto &row : rows) {
-        tavo::ShadowLine line;
-        ASSERT_EQ(tavo::ParseShadowLine(row.text, line), row.code) << row.text;
-        if (row.code == 0) {
-            EXPECT_EQ(line.cannot_change, row.cannot_change) << row.text;
-            EXPECT_EQ(line.expire, row.expire) << row.text;
+        const auto line = tavo::ParseShadowLine(row.text);
+        ASSERT_EQ(line.Failure(), row.code) << row.text;
+        if (line) {
+            EXPECT_EQ(line->cannot_change, row.cannot_change) << row.text;
+            EXPECT_EQ(line->expire, row.expire) << row.text;
         }
     }
-    std::string changed;
-    ASSERT_EQ(tavo::ReplaceShadowHash("Bob:old:123:4:5:6:7:8:9", "new", changed), 0);
-    EXPECT_EQ(changed, "Bob:new:123:4:5:7::8:");
-    EXPECT_EQ(tavo::ReplaceShadowHash("Bob:old", "new", changed), ERR_FORMAT_ERROR);
+    EXPECT_EQ(*tavo::ReplaceShadowHash("Bob:old:123:4:5:6:7:8:9", "new"), "Bob:new:123:4:5:7::8:");
+    EXPECT_EQ(tavo::ReplaceShadowHash("Bob:old", "new").Failure(), ERR_FORMAT_ERROR);
 }
 
 TEST(MiscLine, MarkerOfTheLastId)
@@ -86,10 +84,8 @@ TEST(MiscLine, MarkerOfTheLastId)
     EXPECT_EQ(tavo::ParseMarkerLine("#$_@UID__INDEX@_$1030$", tavo::kUidMarker), 1030);
     for (const char *other : {"#$_@GID__INDEX@_$1030$", "#$_@UID__INDEX@_$x$", "#$_@UID__INDEX@_$1030", "bob:0:"})
         EXPECT_EQ(tavo::ParseMarkerLine(other, tavo::kUidMarker), std::nullopt) << other;
-    tavo::MiscLine line;
-    EXPECT_EQ(tavo::ParseMiscLine("bob:35:bob@example.org", line), 0);
-    EXPECT_EQ(line.privilege, 35);
-    EXPECT_EQ(tavo::ParseMiscLine("bob:35", line), ERR_FORMAT_ERROR);
+    EXPECT_EQ(tavo::ParseMiscLine("bob:35:bob@example.org")->privilege, 35);
+    EXPECT_EQ(tavo::ParseMiscLine("bob:35").Failure(), ERR_FORMAT_ERROR);
 }
 
 TEST(AccountName, KeysFoldCase)
@@ -135,7 +131,7 @@ TEST(IdIndex, FindsTheNextFreeId)
     int32_t id = 0;
     EXPECT_EQ(tavo::FindFreeId(*index, range, id), 0);
     EXPECT_EQ(id, 10) << "nothing handed out yet";
-    index->Set(tavo::IdKey(14), "A");
+    ASSERT_EQ(index->Set(tavo::IdKey(14), "A"), 0);
     EXPECT_EQ(tavo::FindFreeId(*index, range, id), 0);
     EXPECT_EQ(id, 15) << "without the reserved key it follows the greatest one";
     const struct {
@@ -143,12 +139,12 @@ TEST(IdIndex, FindsTheNextFreeId)
         int32_t next;
     } rows[] = {{500, 10}, {0, 10}, {9, 10}, {10, 11}, {13, 15}, {19, 20}, {20, 10}, {21, 10}, {-1, 10}};
     for (const auto &row : rows) {
-        index->SetNumber(tavo::kCurrentUidKey, row.current);
+        ASSERT_EQ(index->SetNumber(tavo::kCurrentUidKey, row.current), 0);
         EXPECT_EQ(tavo::FindFreeId(*index, range, id), 0);
         EXPECT_EQ(id, row.next) << row.current;
     }
     for (int32_t taken = 10; taken <= 20; ++taken)
-        index->Set(tavo::IdKey(taken), "A");
+        ASSERT_EQ(index->Set(tavo::IdKey(taken), "A"), 0);
     EXPECT_EQ(tavo::FindFreeId(*index, range, id), ERR_TOO_MANY_USERS);
 }
 
