@@ -1,18 +1,13 @@
 // Finds the data volumes among the mounts.
 #include "account/detail/quota_volumes.h"
 
-#include <algorithm>
-#include <memory>
-#include <string_view>
+#include "core/detail/mount_table.h"
 
-#include <mntent.h>
+#include <algorithm>
+#include <string_view>
 
 namespace tavo {
 namespace {
-
-struct EndMounts {
-    void operator()(FILE *mounts) const noexcept { ::endmntent(mounts); }
-};
 
 bool IsVolume(std::string_view path)
 {
@@ -25,18 +20,14 @@ bool IsVolume(std::string_view path)
 
 bool ReadMountedVolumes(std::vector<MountedVolume> &volumes)
 {
-    const std::unique_ptr<FILE, EndMounts> mounts(::setmntent("/proc/self/mounts", "re"));
-    if (!mounts)
+    std::vector<Mount> mounts;
+    if (!ReadMounts(mounts))
         return false;
-    mntent entry;
-    std::vector<char> text(16384);  // overlays have options of several pages
-    while (::getmntent_r(mounts.get(), &entry, text.data(), static_cast<int>(text.size()))) {
-        if (!IsVolume(entry.mnt_dir))
-            continue;
-        const bool quotas = ::hasmntopt(&entry, "usrquota") || ::hasmntopt(&entry, "usrjquota") ||
-                            ::hasmntopt(&entry, "quota") || ::hasmntopt(&entry, "uquota");
-        volumes.push_back({entry.mnt_dir, entry.mnt_fsname, quotas});
-    }
+    for (const Mount &mount : mounts)
+        if (IsVolume(mount.point))
+            volumes.push_back(
+                {mount.point, mount.source,
+                 mount.Has("usrquota") || mount.Has("usrjquota") || mount.Has("quota") || mount.Has("uquota")});
     return true;
 }
 

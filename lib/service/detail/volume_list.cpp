@@ -1,7 +1,6 @@
 // The appliance's volumes: file systems mounted at /volume1, /volume2, ...
 #include "service/detail/volume_list.h"
 
-#include "core/detail/open_file.h"
 #include "core/detail/strict_number.h"
 #include "core/detail/text_fields.h"
 
@@ -16,21 +15,6 @@ constexpr std::string_view kStem = "/volume";
 bool OneOf(std::string_view text, std::initializer_list<std::string_view> words)
 {
     return std::find(words.begin(), words.end(), text) != words.end();
-}
-
-bool IsReadWrite(std::string_view options)
-{
-    return options == "rw" || options.starts_with("rw,");
-}
-
-std::string ReadWhole(const char *path)
-{
-    std::string text;
-    const Fd fd = OpenFd(path, O_RDONLY);
-    char block[4096];
-    for (ssize_t got; fd && (got = ::read(fd.Get(), block, sizeof block)) > 0;)
-        text.append(block, static_cast<size_t>(got));
-    return text;
 }
 
 // The kernel's own path of the disk names the bus that the disk is connected to.
@@ -62,17 +46,15 @@ std::string_view VolumeOf(std::string_view path) noexcept
     return VolumeNumber(volume) ? volume : std::string_view();
 }
 
-std::vector<Volume> ParseVolumes(std::string_view mounts)
+std::vector<Volume> VolumesIn(const std::vector<Mount> &mounts)
 {
     std::vector<Volume> volumes;
-    while (!mounts.empty()) {
-        const auto field = SplitFields(TakeLine(mounts));
-        const int number = field.size() >= 4 ? VolumeNumber(field[1]) : 0;
+    for (const Mount &mount : mounts) {
+        const int number = VolumeNumber(mount.point);
         if (number == 0)
             continue;
         std::erase_if(volumes, [&](const Volume &volume) { return volume.number == number; });
-        volumes.push_back(
-            {number, std::string(field[1]), std::string(field[0]), std::string(field[2]), IsReadWrite(field[3])});
+        volumes.push_back({number, mount.point, mount.source, mount.type, mount.Has("rw")});
     }
     std::sort(volumes.begin(), volumes.end(),
               [](const Volume &left, const Volume &right) { return left.number < right.number; });
@@ -81,7 +63,9 @@ std::vector<Volume> ParseVolumes(std::string_view mounts)
 
 std::vector<Volume> MountedVolumes()
 {
-    return ParseVolumes(ReadWhole("/proc/mounts"));
+    std::vector<Mount> mounts;
+    ReadMounts(mounts);  // as far as it can be read
+    return VolumesIn(mounts);
 }
 
 VolumeKind KindOf(const Volume &volume)

@@ -2,6 +2,8 @@
 #ifndef TAVO_SERVICE_DETAIL_VOLUME_LIST_H
 #define TAVO_SERVICE_DETAIL_VOLUME_LIST_H
 
+#include "core/detail/mount_table.h"
+
 #include <string>
 #include <string_view>
 #include <vector>
@@ -18,8 +20,8 @@ struct Volume {
     bool writable = false;
 };
 
-// Lists the volumes in the text of /proc/mounts, by number. If a path is mounted over, its last mount counts.
-std::vector<Volume> ParseVolumes(std::string_view mounts);
+// Lists the volumes among the mounts, by number. If a path is mounted over, its last mount counts.
+std::vector<Volume> VolumesIn(const std::vector<Mount> &mounts);
 
 // Returns the number of "/volumeN"; 0 for anything else.
 int VolumeNumber(std::string_view path) noexcept;

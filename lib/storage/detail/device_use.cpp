@@ -3,8 +3,7 @@
 
 #include "core/detail/open_file.h"
 #include "storage/detail/device_name.h"
-
-#include <glob.h>
+#include "storage/detail/matching_paths.h"
 
 namespace tavo {
 namespace {
@@ -20,12 +19,9 @@ std::string HoldersOf(std::string_view name)
 {
     const std::string pattern = "/sys/class/block/" + std::string(name) + "/holders/*";
     std::string holders;
-    glob_t found = {};
-    if (::glob(pattern.c_str(), 0, nullptr, &found) == 0) {
-        for (size_t i = 0; i < found.gl_pathc; ++i)
-            holders.append(i > 0 ? " " : "").append(LastPart(found.gl_pathv[i]));
-    }
-    ::globfree(&found);
+    if (const auto found = MatchingPaths(pattern))
+        for (const std::string &path : *found)
+            holders.append(holders.empty() ? "" : " ").append(LastPart(path.c_str()));
     return holders;
 }
 

@@ -3,12 +3,11 @@
 
 #include "storage/detail/array_name.h"
 #include "storage/detail/kernel_text.h"
+#include "storage/detail/matching_paths.h"
 #include "storage/detail/open_disk.h"
 
 #include <algorithm>
 #include <optional>
-
-#include <glob.h>
 
 namespace tavo {
 namespace {
@@ -48,14 +47,9 @@ std::string ScsiName(unsigned major_number, unsigned minor_number)
 std::vector<std::string> MemberNames(int array)
 {
     std::vector<std::string> names;
-    glob_t found = {};
-    if (::glob((ArrayFile(array, kMember) + "*").c_str(), 0, nullptr, &found) == 0) {
-        for (size_t i = 0; i < found.gl_pathc; ++i) {
-            const std::string_view path = found.gl_pathv[i];
-            names.emplace_back(path.substr(path.rfind(kMember) + kMember.size()));
-        }
-    }
-    ::globfree(&found);
+    if (const auto found = MatchingPaths(ArrayFile(array, kMember) + "*"))
+        for (const std::string &path : *found)
+            names.push_back(path.substr(path.rfind(kMember) + kMember.size()));
     return names;
 }
 

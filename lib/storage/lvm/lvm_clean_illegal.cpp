@@ -3,11 +3,11 @@
 
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
+#include "core/detail/mount_table.h"
 #include "core/detail/text_fields.h"
 #include "storage/detail/device_name.h"
 #include "storage/detail/device_use.h"
 #include "storage/detail/kernel_text.h"
-#include "storage/detail/mount_table.h"
 #include "storage/detail/usb_id.h"
 #include "storage/detail/volume_name.h"
 

@@ -3,8 +3,8 @@
 
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
+#include "core/detail/mount_table.h"
 #include "storage/detail/device_name.h"
-#include "storage/detail/mount_table.h"
 #include "storage/detail/partition_command.h"
 #include "storage/detail/volume_name.h"
 

@@ -8,40 +8,21 @@
 #include "core/detail/model_setting.h"
 #include "storage/detail/device_name.h"
 #include "storage/detail/disk_path.h"
+#include "storage/detail/matching_paths.h"
 
 #include <string>
-
-#include <glob.h>
 
 namespace {
 
 constexpr int kLastSystemArray = 99;
 
-class Members {
-  public:
-    Members() : error_(::glob("/sys/block/md0/md/dev-*", 0, nullptr, &found_)) {}
-    ~Members() { ::globfree(&found_); }
-    Members(const Members &) = delete;
-    Members &operator=(const Members &) = delete;
-
-    bool Failed() const { return error_ != 0 && error_ != GLOB_NOMATCH; }
-    size_t Count() const { return error_ == 0 ? found_.gl_pathc : 0; }
-    std::string Disk(size_t i) const
-    {
-        const std::string_view path = found_.gl_pathv[i];
-        return std::string(tavo::WithoutNumber(path.substr(path.rfind('-') + 1)));
-    }
-
-  private:
-    glob_t found_ = {};
-    int error_;
-};
-
-int VersionOfMembers(const Members &members)
+int VersionOfMembers(const std::vector<std::string> &members)
 {
     int version = 0;
-    for (size_t i = 0; i < members.Count() && version == 0; ++i)
-        BlTAVOCheckPartitionLayout(members.Disk(i).c_str(), 1, &version);
+    for (size_t i = 0; i < members.size() && version == 0; ++i) {
+        const std::string name = members[i].substr(members[i].rfind('-') + 1);
+        BlTAVOCheckPartitionLayout(std::string(tavo::WithoutNumber(name)).c_str(), 1, &version);
+    }
     return version;
 }
 
@@ -71,12 +52,12 @@ extern "C" int PartitionLayoutGet(int *pVersion)
         return -1;
     }
     return Guard([&] {
-        const Members members;
-        if (members.Failed()) {
+        const auto members = tavo::MatchingPaths("/sys/block/md0/md/dev-*");
+        if (!members) {
             LogError("%s:%d Failed to list the members of the system array");
             return -1;
         }
-        const int version = members.Count() > 0 ? VersionOfMembers(members) : VersionOfBays();
+        const int version = members->empty() ? VersionOfBays() : VersionOfMembers(*members);
         *pVersion = version ? version : int{PARTITION_VERSION_CURRENT};
         return 0;
     });

@@ -4,6 +4,7 @@
 
 #include "account/user/user_fixture.h"
 #include "support/captured_log.h"
+#include "support/device_tree.h"
 #include "support/fault_state.h"
 #include "support/scenario.h"
 
@@ -14,8 +15,6 @@
 #include <limits>
 
 #include <errno.h>
-#include <mntent.h>
-#include <stdio.h>
 #include <sys/quota.h>
 
 using test::FaultOf;
@@ -37,11 +36,10 @@ std::vector<KernelCall> kernel_calls;
 int kernel_errno = 0;
 std::string failing_device = {};
 dqblk kernel_block = {};
-std::string mounts;
 
 }  // namespace
 
-// Take the place of the kernel: its quotas and its list of mounts.
+// Takes the place of the kernel's quotas.
 extern "C" int quotactl(int command, const char *device, int id, caddr_t data) noexcept
 {
     KernelCall call{command, device, id};
@@ -61,12 +59,6 @@ extern "C" int quotactl(int command, const char *device, int id, caddr_t data) n
     return 0;
 }
 
-extern "C" FILE *setmntent(const char *path, const char *) noexcept
-{
-    EXPECT_STREQ(path, "/proc/self/mounts");
-    return mounts.empty() ? nullptr : ::fmemopen(mounts.data(), mounts.size(), "r");
-}
-
 namespace {
 
 constexpr char kDevice[] = "/dev/vg1/volume_1";
@@ -81,6 +73,8 @@ class Quota : public testing::Test {
         test::AddUser({.name = "alice", .uid = 2000});
         test::ForgetFault();
     }
+
+    test::DeviceTree tree_;
 };
 
 int Set(const char *user, const char *device, float limit)
@@ -197,9 +191,9 @@ TEST_F(Quota, CleansWhoIsThereOnEveryVolume)
     TLIBSzListRemoveAll(users);
     TLIBSzListPush(&users, "alice");
     kernel_calls.clear();
-    mounts = "/dev/md0 / ext4 rw,usrquota 0 0\n/dev/md2 /volume1 ext4 rw,usrquota,grpquota 0 0\n"
-             "/dev/md3 /volume2 ext4 rw 0 0\n/dev/md4 /volume13 ext4 rw,usrjquota=aquota.user 0 0\n"
-             "/dev/md5 /volume1/sub ext4 rw,usrquota 0 0\n";
+    tree_.Put("/proc/mounts", "/dev/md0 / ext4 rw,usrquota 0 0\n/dev/md2 /volume1 ext4 rw,usrquota,grpquota 0 0\n"
+                              "/dev/md3 /volume2 ext4 rw 0 0\n/dev/md4 /volume13 ext4 rw,usrjquota=aquota.user 0 0\n"
+                              "/dev/md5 /volume1/sub ext4 rw,usrquota 0 0\n");
     EXPECT_EQ(TAVOQuotaCleanAllVols(users), 0);
     ASSERT_EQ(kernel_calls.size(), 4u);
     EXPECT_EQ(kernel_calls[0].device, "/dev/md2");
@@ -225,7 +219,7 @@ const std::vector<std::string> kOff{"quotaoff", "/volume1"};
 
 TEST_F(Quota, SwitchesInSteps)
 {
-    mounts = "/dev/md2 /volume1 ext4 rw 0 0\n";
+    tree_.Put("/proc/mounts", "/dev/md2 /volume1 ext4 rw 0 0\n");
     const std::vector<std::string> steps[] = {kRemount, kCheck, kOn};
     const int codes[] = {ERR_QUOTA_REMOUNT, ERR_QUOTA_CHECK, ERR_QUOTA_ON};
     for (size_t failing = 0; failing <= std::size(steps); ++failing) {
@@ -249,7 +243,7 @@ TEST_F(Quota, SwitchesInSteps)
 TEST_F(Quota, NothingRunsOnAVolumeThatIsNotMounted)
 {
     test::Scenario scenario;
-    mounts = "/dev/md2 /volume10 ext4 rw 0 0\n/dev/volume1 /mnt/volume1 ext4 rw 0 0\n";
+    tree_.Put("/proc/mounts", "/dev/md2 /volume10 ext4 rw 0 0\n/dev/volume1 /mnt/volume1 ext4 rw 0 0\n");
     for (const int volume : {1, 0, -1, 101}) {
         EXPECT_EQ(FaultOf(TAVOQuotaInit(volume)).code, ERR_BAD_PARAMETERS) << volume;
         EXPECT_EQ(FaultOf(TAVOQuotaOff(volume)).code, ERR_BAD_PARAMETERS);

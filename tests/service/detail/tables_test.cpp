@@ -79,16 +79,16 @@ TEST(ServiceTables, ArePrintedInThePage)
 
 TEST(Volumes, ReadFromTheMounts)
 {
-    const auto volumes = tavo::ParseVolumes("proc /proc proc rw 0 0\n"
-                                            "/dev/vg1/lv2 /volume2 ext4 ro,relatime 0 0\n"
-                                            "/dev/md2 /volume1 ext4 rw 0 0\n"
-                                            "/dev/sdq1 /volumeUSB1/usbshare vfat rw 0 0\n"
-                                            "server:/export /volume10 nfs rw 0 0\n"
-                                            "/dev/md3 /volume2 ext4 rw,relatime 0 0\n"
-                                            "/dev/md4 /volume01 ext4 rw 0 0\n"
-                                            "/dev/md5 /volume1x ext4 rw 0 0\n"
-                                            "/dev/md6 /volume1/sub ext4 rw 0 0\n"
-                                            "short\n");
+    const auto volumes = tavo::VolumesIn(tavo::ParseMounts("proc /proc proc rw 0 0\n"
+                                                           "/dev/vg1/lv2 /volume2 ext4 ro,relatime 0 0\n"
+                                                           "/dev/md2 /volume1 ext4 rw 0 0\n"
+                                                           "/dev/sdq1 /volumeUSB1/usbshare vfat rw 0 0\n"
+                                                           "server:/export /volume10 nfs rw 0 0\n"
+                                                           "/dev/md3 /volume2 ext4 rw,relatime 0 0\n"
+                                                           "/dev/md4 /volume01 ext4 rw 0 0\n"
+                                                           "/dev/md5 /volume1x ext4 rw 0 0\n"
+                                                           "/dev/md6 /volume1/sub ext4 rw 0 0\n"
+                                                           "short\n"));
     ASSERT_EQ(volumes.size(), 3u);
     EXPECT_EQ(volumes[0].path, "/volume1");
     EXPECT_TRUE(volumes[0].writable);

@@ -5,7 +5,6 @@
 #include "storage/detail/array_name.h"
 #include "storage/detail/lvm_line.h"
 #include "storage/detail/mdadm_examine.h"
-#include "storage/detail/mount_table.h"
 #include "storage/detail/volume_name.h"
 #include "support/captures.h"
 
@@ -194,15 +193,6 @@ TEST(VolumeName, BothSpellings)
         EXPECT_FALSE(tavo::IsGroupPath(bad)) << bad;
     EXPECT_TRUE(tavo::IsGroupPath("/dev/vg1"));
     EXPECT_TRUE(tavo::IsGroupPath("/dev/vg_a.b+c-d"));
-}
-
-TEST(MountTable, PathsAreDecoded)
-{
-    const auto mounts = tavo::ParseMounts("/dev/vg1/lvs1 /mnt/a\\040b\\134 ext4 rw 0 0\nshort line\n");
-    ASSERT_EQ(mounts.size(), 1u);
-    EXPECT_EQ(mounts[0].source, "/dev/vg1/lvs1");
-    EXPECT_EQ(mounts[0].point, "/mnt/a b\\");
-    EXPECT_EQ(mounts[0].type, "ext4");
 }
 
 }  // namespace

@@ -1,5 +1,5 @@
 // /proc/mounts.
-#include "storage/detail/mount_table.h"
+#include "core/detail/mount_table.h"
 
 #include "core/detail/line_reader.h"
 #include "core/detail/open_file.h"
@@ -30,13 +30,23 @@ std::string Decoded(std::string_view field)
 
 }  // namespace
 
+bool Mount::Has(std::string_view option) const
+{
+    for (std::string_view rest = options; !rest.empty();) {
+        const std::string_view one = TakeUntil(rest, ',');
+        if (one.substr(0, one.find('=')) == option)
+            return true;
+    }
+    return false;
+}
+
 std::vector<Mount> ParseMounts(std::string_view text)
 {
     std::vector<Mount> mounts;
     while (!text.empty()) {
         const std::vector<std::string_view> fields = SplitFields(TakeLine(text));
-        if (fields.size() >= 3)
-            mounts.push_back({Decoded(fields[0]), Decoded(fields[1]), std::string(fields[2])});
+        if (fields.size() >= 4)
+            mounts.push_back({Decoded(fields[0]), Decoded(fields[1]), std::string(fields[2]), std::string(fields[3])});
     }
     return mounts;
 }

@@ -1,6 +1,6 @@
 // /proc/mounts.
-#ifndef TAVO_STORAGE_DETAIL_MOUNT_TABLE_H
-#define TAVO_STORAGE_DETAIL_MOUNT_TABLE_H
+#ifndef TAVO_CORE_DETAIL_MOUNT_TABLE_H
+#define TAVO_CORE_DETAIL_MOUNT_TABLE_H
 
 #include <string>
 #include <string_view>
@@ -12,9 +12,13 @@ struct Mount {
     std::string source;
     std::string point;
     std::string type;
+    std::string options;  // with commas
+
+    // Whole options only: "quota" is not one of "rw,usrquota". Of "usrquota=FILE" the name is enough.
+    bool Has(std::string_view option) const;
 };
 
-// Blanks in a path stand as \040 there.
+// Blanks in a path are \040 there.
 std::vector<Mount> ParseMounts(std::string_view text);
 
 // All mounts; false when the file cannot be read.
