@@ -46,13 +46,13 @@ TAVO_API int TAVOSupportQUOTA(void);
  *   ERR_QUOTA_CHECK     the quota files cannot be built; also while another process writes to the volume
  *   ERR_QUOTA_ON        the kernel does not take them
  *   ERR_QUOTA_SHELL     a command could not be run, or was killed
- * Files: /proc/self/mounts
+ * Files: /proc/mounts
  * Runs: /bin/mount, /sbin/quotacheck, /sbin/quotaon */
 TAVO_API int TAVOQuotaInit(int nVolume);
 
 /* Switches quotas off for the volume. Fails with ERR_BAD_PARAMETERS and ERR_QUOTA_SHELL as above, and with
  * ERR_QUOTA_OFF when quotaoff fails.
- * Files: /proc/self/mounts
+ * Files: /proc/mounts
  * Runs: /sbin/quotaoff */
 TAVO_API int TAVOQuotaOff(int nVolume);
 
@@ -91,9 +91,9 @@ TAVO_API int TAVOQuotaFmtGet(const char *szDevice);
  * Locks: TAVO_LOCK_USER (shared, at most 5 s) */
 TAVO_API int TAVOQuotaClean(const TLIBSZLIST *pslUsers, const char *szDevice);
 
-/* The same on every volume that is mounted with quotas for users (the mount options in /proc/self/mounts). Each volume
+/* The same on every volume that is mounted with quotas for users (the mount options in /proc/mounts). Each volume
  * that fails is logged. ERR_READ_FAILED when the mounts cannot be read.
- * Files: /proc/self/mounts, /etc/passwd, /tmp/.db.user.*
+ * Files: /proc/mounts, /etc/passwd, /tmp/.db.user.*
  * Locks: TAVO_LOCK_USER (shared, at most 5 s) */
 TAVO_API int TAVOQuotaCleanAllVols(const TLIBSZLIST *pslUsers);
 

@@ -10,6 +10,7 @@
 #include "network/detail/process_identity.h"
 
 #include <algorithm>
+#include <charconv>
 
 #include <net/route.h>
 #include <unistd.h>

@@ -7,6 +7,8 @@
 #include <algorithm>
 #include <climits>
 
+#include <unistd.h>
+
 namespace tavo {
 namespace {
 
