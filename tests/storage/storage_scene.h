@@ -9,6 +9,7 @@
 #include "support/fault_state.h"
 #include "support/recorded_calls.h"
 #include "support/recorded_commands.h"
+#include "support/story.h"
 
 #include <gmock/gmock.h>
 
@@ -32,6 +33,19 @@ class StorageScene : public testing::Test {
     RecordedCalls calls_;
     RecordedCommands commands_;
 };
+
+#ifdef TEST_GOLDEN  // in the folders that have stories
+class StorageStory : public StorageScene {
+  protected:
+    // Without the commands that match the pattern.
+    explicit StorageStory(const std::string &without = "")
+        : story_(TEST_GOLDEN, {CommandsOf(commands_, without), CallsOf(calls_), LogOf(log_)})
+    {
+    }
+
+    Story story_;
+};
+#endif
 
 }  // namespace test
 

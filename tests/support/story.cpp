@@ -128,10 +128,12 @@ void Story::End(const std::string &text)
     }
 }
 
-Story::Source CommandsOf(RecordedCommands &commands)
+Story::Source CommandsOf(RecordedCommands &commands, const std::string &without)
 {
-    return [&commands] {
-        return WithBegin("run ", commands.Take());
+    return [&commands, pattern = std::regex(without), is_whole = without.empty()] {
+        std::vector<std::string> lines = commands.Take();
+        std::erase_if(lines, [&](const std::string &line) { return !is_whole && std::regex_search(line, pattern); });
+        return WithBegin("run ", lines);
     };
 }
 

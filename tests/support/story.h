@@ -74,7 +74,8 @@ class Story {
 
 #define TELL(...) story_.Tell(#__VA_ARGS__, [&] { return __VA_ARGS__; })
 
-Story::Source CommandsOf(RecordedCommands &commands);
+// Without the commands that match the pattern.
+Story::Source CommandsOf(RecordedCommands &commands, const std::string &without = "");
 Story::Source LogOf(CapturedLog &log);
 // Those of the calls that begin so.
 Story::Source CallsOf(RecordedCalls &calls, const std::string &begin = "");
