@@ -6,7 +6,6 @@
 
 #include <gtest/gtest.h>
 
-#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -30,7 +29,7 @@ std::vector<std::string> WithBegin(const char *begin, std::vector<std::string> l
 std::string TextOf(int code)
 {
     const auto index = static_cast<size_t>(code) / 0x100;
-    if (index < std::size(rgszErrMsg) && *rgszErrMsg[index])
+    if (code % 0x100 == 0 && index < std::size(rgszErrMsg) && *rgszErrMsg[index])
         return rgszErrMsg[index];
     char number[16];
     std::snprintf(number, sizeof number, "0x%04X", static_cast<unsigned>(code));

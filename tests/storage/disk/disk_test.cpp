@@ -14,17 +14,12 @@
 #include <memory>
 #include <random>
 #include <sstream>
+#include <utility>
 
 #include <fcntl.h>
 #include <linux/fs.h>
 #include <linux/hdreg.h>
-#include <syslog.h>
 #include <unistd.h>
-
-using test::Fault;
-using test::LastFault;
-using testing::ElementsAre;
-using testing::IsEmpty;
 
 namespace {
 
@@ -49,7 +44,7 @@ test::RecordedCalls::Request Drive(uint64_t bytes = kDiskBytes, int attribute = 
     };
 }
 
-class Disk : public test::StorageScene {
+class Disk : public test::StorageStory {
   protected:
     void AddDrive(const std::string &name, unsigned minor, const std::string &model)
     {
@@ -76,16 +71,11 @@ TEST_F(Disk, PathParse)
     EXPECT_EQ(log_.Take(), "");
 
     for (const char *bad : {"", "sd", "/dev/sd", "/dev/hda", "/dev//sda", "//dev/sda", "sda x", "sdabc", "sd1", "sdA",
-                            "sda99999999999", "hda", "sda-1"}) {
+                            "sda99999999999", "hda", "sda-1", static_cast<const char *>(nullptr)}) {
         DISKPATH path = {7, 7, 7, 7};
-        EXPECT_EQ(DiskPathParse(bad, &path), -1) << bad;
+        TELL(DiskPathParse(bad, &path));
         EXPECT_EQ(path.iDisk, 7) << bad;
     }
-    EXPECT_THAT(log_.Take(), testing::EndsWith("disk_path_parse:# bad paramters: disk path: hda\n"
-                                               "disk_path_parse:# bad paramters: disk path: sda-1, ptr = -"));
-    DISKPATH path;
-    EXPECT_EQ(DiskPathParse(nullptr, &path), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "disk_path_parse"}));
 }
 
 TEST_F(Disk, InfoOfTheWholeDisk)
@@ -107,26 +97,20 @@ TEST_F(Disk, EmptyBaysAndFailures)
     tree_.AddAbsent("/dev/sdb");
     AddDrive("sdc", 32, "x");
     DISKINFO *info = nullptr;
-    test::ForgetFault();
-    EXPECT_EQ(DiskInfoGet("/dev/sdb", &info), 0);
-    EXPECT_EQ(log_.Take(), "") << "an empty bay is nothing to report";
-    EXPECT_EQ(LastFault(), Fault{});
-    EXPECT_EQ(DiskInfoGet("/dev/sdq", &info), -1);
-    EXPECT_EQ(DiskInfoGet("/dev/sdc", &info), -1);
-    EXPECT_EQ(log_.Take(), "disk_info_get:# Failed to open /dev/sdq, errno=No such file or directory\n"
-                           "disk_info_get:# Failed to ioctl /dev/sdc, errno=Inappropriate ioctl for device");
-    EXPECT_EQ(DiskInfoGet("rubbish", &info), -1);
+    for (const char *path : {"/dev/sdb", "/dev/sdq", "/dev/sdc", "rubbish"}) {
+        story_.Head(path);
+        TELL(DiskInfoGet(path, &info));
+    }
     EXPECT_EQ(info, nullptr);
-
     uint64_t sectors = 5;
-    EXPECT_EQ(DiskSizeGet("/dev/sdb", &sectors), 0);
-    EXPECT_EQ(DiskSizeGet("/dev/sdq", &sectors), -1);
+    TELL(DiskSizeGet("/dev/sdb", &sectors));
+    TELL(DiskSizeGet("/dev/sdq", &sectors));
     EXPECT_EQ(sectors, 5u);
     calls_.OnIoctl(Drive(1535));
-    EXPECT_EQ(DiskSizeGet("/dev/sdc", &sectors), 1);
-    EXPECT_EQ(sectors, 2u);
-    EXPECT_EQ(DiskIsExist("/dev/sdc"), 1);
-    EXPECT_EQ(DiskIsExist("/dev/sdb"), 0);
+    TELL(DiskSizeGet("/dev/sdc", &sectors));
+    story_.Show("sectors", sectors);
+    TELL(DiskIsExist("/dev/sdc"));
+    TELL(DiskIsExist("/dev/sdb"));
 }
 
 TEST_F(Disk, EnumHasTheBaysInOrderThenTheUnits)
@@ -142,34 +126,24 @@ TEST_F(Disk, EnumHasTheBaysInOrderThenTheUnits)
     AddDrive("sdac", 80, "unit, third");
     AddDrive("sde", 96, "beyond the bays");
     calls_.OnIoctl(Drive());
-    const auto enumerate = [](const int *filter) {
+    const auto enumerate = [&](const int *filter) {
         std::vector<std::string> found;
         DISKLIST *list = nullptr;
-        EXPECT_GE(DiskInfoEnum(filter, &list), 0);
+        TELL(DiskInfoEnum(filter, &list));
         for (const DISKLIST *node = list; node; node = node->pNext)
             found.push_back(std::string(node->pInfo->szPath) + " " + node->pInfo->szModel);
         DiskInfoEnumFree(list);
-        return found;
+        story_.Show("disks", found);
     };
-    test::ForgetFault();
-    EXPECT_THAT(enumerate(nullptr),
-                ElementsAre("/dev/sda first", "/dev/sdc third", "/dev/sdaa unit, first", "/dev/sdac unit, third"));
-    const int internal = DISK_ENUM_INTERNAL;
+    // Neither a missing node nor an empty bay is worth a line.
+    enumerate(nullptr);
+    for (const int filter : {int{DISK_ENUM_INTERNAL}, int{DISK_ENUM_UNITS}, 0})
+        enumerate(&filter);
+    tree_.Put("/sys/class/ata_link/link4/sata_spd", "<unknown>\n");  // switched off
     const int units = DISK_ENUM_UNITS;
-    const int none = 0;
-    EXPECT_THAT(enumerate(&internal), ElementsAre("/dev/sda first", "/dev/sdc third"));
-    EXPECT_EQ(enumerate(&units).size(), 2u);
-    EXPECT_EQ(enumerate(&none).size(), 4u);
-    EXPECT_EQ(log_.Take(), "") << "neither a missing node nor an empty bay is worth a line";
-    EXPECT_EQ(LastFault(), Fault{});
-
-    tree_.Put("/sys/class/ata_link/link4/sata_spd", "<unknown>\n");
-    EXPECT_THAT(enumerate(&units), IsEmpty()) << "switched off";
+    enumerate(&units);
     tree_.Remove("/sys/class");
-    DISKLIST *list = nullptr;
-    EXPECT_EQ(DiskInfoEnum(nullptr, &list), -1);
-    EXPECT_EQ(list, nullptr);
-    EXPECT_EQ(log_.Take(), "disk_info_enum:# Failed to enum ebox, errno=0x900");
+    enumerate(nullptr);
 }
 
 TEST_F(Disk, BaysAndLimitsOfTheModel)
@@ -204,56 +178,37 @@ TEST_F(Disk, KernelNumbersIdeFirstWholeDisksOnly)
     int32_t *numbers = nullptr;
     ASSERT_EQ(TAVODiskEnum(1, &numbers), 8);
     EXPECT_THAT(std::vector<int32_t>(numbers, numbers + 8),
-                ElementsAre(832, 2048, 2064, 2080, 2096, 2112, 2128, 16656));
+                testing::ElementsAre(832, 2048, 2064, 2080, 2096, 2112, 2128, 16656));
     std::free(numbers);
 
     tree_.AddDisk("/dev/sdb", 8, 16);
     TAVODISKINFO *info = nullptr;
-    ASSERT_EQ(TAVODiskGetInfo(1, 2064, &info), 0);
+    TELL(TAVODiskGetInfo(1, 2064, &info));
     std::ostringstream text;
     text << info->nDevice << " " << info->szName << " " << info->nKind << " " << info->cMibDisk << " " << info->nStatus;
-    EXPECT_EQ(text.str(), "2064 sdb 7 96 0");
-    std::free(info);
-
-    const struct {
-        int kind, number, code;
-    } refusals[] = {{2, 2064, ERR_BAD_PARAMETERS},
-                    {1, 2065, ERR_NO_DISK_ID},  // a partition
-                    {1, 9999, ERR_NO_DISK_ID},
-                    {1, 2080, ERR_DISK_IO_FAILED}};  // no node
-    for (const auto &row : refusals) {
-        info = nullptr;
-        EXPECT_EQ(TAVODiskGetInfo(row.kind, row.number, &info), -1);
-        EXPECT_EQ(LastFault(), (Fault{row.code, "disk_get_info"})) << row.number;
-        EXPECT_EQ(info, nullptr);
-    }
+    story_.Show("disk", text.str());
+    std::free(std::exchange(info, nullptr));
+    TELL(TAVODiskGetInfo(2, 2064, &info));
+    TELL(TAVODiskGetInfo(1, 2065, &info));  // a partition
+    TELL(TAVODiskGetInfo(1, 9999, &info));
+    TELL(TAVODiskGetInfo(1, 2080, &info));  // no node
+    EXPECT_EQ(info, nullptr);
     tree_.Put("/proc/partitions", "major minor  #blocks  name\n\n");
-    EXPECT_EQ(TAVODiskEnum(1, &numbers), 0);
+    TELL(TAVODiskEnum(1, &numbers));
     EXPECT_EQ(numbers, nullptr);
     tree_.Remove("/proc/partitions");
-    EXPECT_EQ(TAVODiskEnum(1, &numbers), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "disk_enum"}));
+    TELL(TAVODiskEnum(1, &numbers));
 }
 
 TEST_F(Disk, ContainerGet)
 {
     Model("esatadiskname=\"sdy\"\n");
-    const struct {
-        const char *path;
-        int kind;  // 0: refused
-    } rows[] = {
-        {"/dev/sda", 1},   {"sdj", 1}, {"sdj3\n", 1},   {"sdk", 4},      {"/dev/sdk1", 4}, {"sdab", 2},
-        {"/dev/sdab5", 2}, {"sdy", 8}, {"/dev/sdy", 8}, {"sdy1", 4},     {"sd", 0},        {"", 0},
-        {"hda", 0},        {"sd1", 0}, {"sda-", 0},     {"/dev/md0", 0},
-    };
-    for (const auto &row : rows) {
+    for (const char *path : {"/dev/sda", "sdj", "sdj3\n", "sdk", "/dev/sdk1", "sdab", "/dev/sdab5", "sdy", "/dev/sdy",
+                             "sdy1", "sd", "", "hda", "sd1", "sda-", "/dev/md0"}) {
         int kind = 0;
-        EXPECT_EQ(DiskContainerGet(row.path, &kind), row.kind ? 0 : -1) << row.path;
-        EXPECT_EQ(kind, row.kind) << row.path;
-        const bool complains = std::any_of(log_.Lines().begin(), log_.Lines().end(),
-                                           [](const auto &line) { return line.priority == LOG_ERR; });
-        EXPECT_EQ(complains, row.kind == 0) << row.path;
-        log_.Clear();
+        story_.Head(path);
+        TELL(DiskContainerGet(path, &kind));
+        story_.Show("kind", kind);
     }
 }
 
@@ -280,16 +235,13 @@ TEST_F(Disk, ModelOfADrive)
 {
     AddDrive("sda", 0, "NASLAB-HD-0     ");
     tree_.AddDisk("/dev/sdb", 8, 16);
-    char model[128];
-    EXPECT_EQ(TAVOLnxDiskGetModel("/dev/sda", model, sizeof model), 0);
-    EXPECT_STREQ(model, "NASLAB-HD-0     ");
-    EXPECT_EQ(TAVOLnxDiskGetModel("/dev/sda", model, 7), 0);
-    EXPECT_STREQ(model, "NASLAB");
-    EXPECT_EQ(log_.Take(), "");
-    EXPECT_EQ(TAVOLnxDiskGetModel("/dev/sdb", model, sizeof model), -1);
-    EXPECT_EQ(TAVOLnxDiskGetModel("/dev/sdz", model, sizeof model), -1);
-    EXPECT_EQ(log_.Take(), "lnx_disk_get_model (#) Failed to open /sys/block/sdb/device/model\n"
-                           "lnx_disk_get_model(#) Failed to open /dev/sdz. 2 (No such file or directory)");
+    char model[128] = "";
+    for (const int size : {128, 7}) {
+        TELL(TAVOLnxDiskGetModel("/dev/sda", model, size));
+        story_.Show("model", model);
+    }
+    TELL(TAVOLnxDiskGetModel("/dev/sdb", model, sizeof model));
+    TELL(TAVOLnxDiskGetModel("/dev/sdz", model, sizeof model));
 }
 
 TEST_F(Disk, IsMvSocDriverFollowsTheLink)
@@ -298,17 +250,14 @@ TEST_F(Disk, IsMvSocDriverFollowsTheLink)
     const struct {
         const char *link;
         const char *id;  // of the controller; NULL for no such file
-        int result;
-    } rows[] = {
-        {"../../../0:0:0:0", nullptr, 0},
-        {"../../devices/platform/host3/target3:0:0/3:0:0:0", nullptr, 1},
-        {pci, "0x7042\n", 1},
-        {pci, "0x6145\n", 1},
-        {pci, "0x7042", 0},
-        {pci, "0x8086\n", 0},
-        {pci, nullptr, -1},
-        {nullptr, nullptr, -1},
-    };
+    } rows[] = {{"../../../0:0:0:0", nullptr},
+                {"../../devices/platform/host3/target3:0:0/3:0:0:0", nullptr},
+                {pci, "0x7042\n"},
+                {pci, "0x6145\n"},
+                {pci, "0x7042"},
+                {pci, "0x8086\n"},
+                {pci, nullptr},
+                {nullptr, nullptr}};
     tree_.Put("/sys/block/sda/size", "1\n");
     for (const auto &row : rows) {
         tree_.Remove("/sys/block/sda/device");
@@ -317,11 +266,8 @@ TEST_F(Disk, IsMvSocDriverFollowsTheLink)
             tree_.Link("/sys/block/sda/device", row.link);
         if (row.id)
             tree_.Put("/sys/devices/pci0000:00/0000:00:01.0/device", row.id);
-        EXPECT_EQ(TAVODiskIsMvSocDriver("/dev/sda"), row.result) << (row.link ? row.link : "");
-        const auto failed = testing::MatchesRegex("readlink\\(\\) from /sys/block/sda/.+ failed\\. \\(.+\\)");
-        EXPECT_THAT(log_.Texts(), testing::Each(failed));
-        EXPECT_EQ(log_.Lines().size(), row.result < 0 ? 1u : 0u);
-        log_.Clear();
+        story_.Head(std::string(row.link ? row.link : "no link") + ", " + (row.id ? row.id : "no id"));
+        TELL(TAVODiskIsMvSocDriver("/dev/sda"));
     }
 }
 
@@ -371,12 +317,12 @@ TEST_F(Disk, NameOfADescriptorIsTheKernels)
     EXPECT_EQ(name_of("/dev/sda"), "/dev/sda3");
     EXPECT_EQ(name_of("/dev/sdb"), "/dev/cciss/c0d0");
     EXPECT_EQ(name_of("/dev/null"), "(none)");
-    EXPECT_EQ(LastFault(), (Fault{ERR_NOT_A_DISK, "disk_get_devname_from_fd"}));
+    EXPECT_EQ(test::LastFault(), (test::Fault{ERR_NOT_A_DISK, "disk_get_devname_from_fd"}));
     EXPECT_EQ(TAVODiskGetDevnameFromFd(-1), nullptr);
-    EXPECT_EQ(LastFault(), (Fault{ERR_STAT_FAILED, "disk_get_devname_from_fd"}));
+    EXPECT_EQ(test::LastFault(), (test::Fault{ERR_STAT_FAILED, "disk_get_devname_from_fd"}));
 }
 
-class Layout : public test::StorageScene {
+class Layout : public test::StorageStory {
   protected:
     Layout() { std::memset(layout_.get(), 0x5A, sizeof *layout_); }
 
@@ -411,35 +357,31 @@ TEST_F(Layout, TakesTheRowsOfItsDiskAlone)
     EXPECT_EQ(layout_->nEntry, 0);
     EXPECT_EQ(layout_->nKind, DISK_LAYOUT_UNSET);
     tree_.Remove("/proc/partitions");
-    EXPECT_EQ(DiskPartitionsLayoutGet("sda", layout_.get()), -1);
-    EXPECT_THAT(log_.Take(), testing::HasSubstr("disk_partitions_layout_get:# Failed to read line of /proc/partitions, "
-                                                "errno=0x900"));
-    EXPECT_EQ(DiskPartitionsLayoutGet("s", layout_.get()), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "disk_partitions_layout_get"}));
+    TELL(DiskPartitionsLayoutGet("sda", layout_.get()));
+    TELL(DiskPartitionsLayoutGet("s", layout_.get()));
 }
 
 TEST_F(Layout, KnowsSystemDisksAndSpecialDevices)
 {
+    const auto get = [&] {
+        TELL(DiskPartitionsLayoutGet("sdb", layout_.get()));
+        story_.Show("kind", layout_->nKind);
+        story_.Show("second entry", layout_->rgEntry[2].nKind);
+        story_.Show("third entry", layout_->rgEntry[3].nKind);
+    };
     tree_.Put("/proc/partitions", "   8  16  98304 sdb\n   8  17  1 sdb1\n");
     Model("supportraid=\"yes\"\n");
-    const std::string first = "/sbin/sfdisk -l -uS -N1 /dev/sdb";
-    const std::string second = "/sbin/sfdisk -l -uS -N2 /dev/sdb";
-    commands_.Print({{first, "/dev/sdb1 256 4980735 4980480 fd Linux raid autodetect\n"},
-                     {second, "/dev/sdb2 4980736 9175039 4194304 fd Linux raid autodetect\n"}});
-    ASSERT_EQ(DiskPartitionsLayoutGet("sdb", layout_.get()), 0);
-    EXPECT_EQ(layout_->nKind, DISK_LAYOUT_SYSTEM);
-    EXPECT_EQ(layout_->rgEntry[3].nKind, DISK_ENTRY_DATA);
-    EXPECT_THAT(commands_.Take(), ElementsAre(first, second));
-
+    commands_.Print(
+        {{"/sbin/sfdisk -l -uS -N1 /dev/sdb", "/dev/sdb1 256 4980735 4980480 fd Linux raid autodetect\n"},
+         {"/sbin/sfdisk -l -uS -N2 /dev/sdb", "/dev/sdb2 4980736 9175039 4194304 fd Linux raid autodetect\n"}});
+    get();
     commands_.Exit(1);
     const std::string usb = "/sys/devices/pci0000:00/usb1/1-1/";
     tree_.Put(usb + "1-1:1.0/host6/target6:0:0/6:0:0:0/model", "x\n");
     tree_.Put(usb + "idVendor", "05ac\n");
     tree_.Put(usb + "idProduct", "1209\n");
     tree_.Link("/sys/block/sdb/device", "../../devices/pci0000:00/usb1/1-1/1-1:1.0/host6/target6:0:0/6:0:0:0");
-    ASSERT_EQ(DiskPartitionsLayoutGet("sdb", layout_.get()), 0);
-    EXPECT_EQ(layout_->nKind, DISK_LAYOUT_SPECIAL);
-    EXPECT_EQ(layout_->rgEntry[2].nKind, DISK_ENTRY_SPECIAL);
+    get();
 }
 
 // Whatever the kernel's file says, nothing outside the caller's block is written.

@@ -7,15 +7,9 @@
 #include <gmock/gmock.h>
 
 #include <cstdio>
-#include <functional>
+#include <utility>
 
-#include <syslog.h>
 #include <unistd.h>
-
-using test::Quiet;
-using testing::ElementsAre;
-using testing::HasSubstr;
-using testing::IsEmpty;
 
 namespace {
 
@@ -49,7 +43,7 @@ std::string SfdiskLine(const TAVOPARTPLACE &place)
     return line;
 }
 
-class Partitions : public test::StorageScene {
+class Partitions : public test::StorageStory {
   protected:
     // What the partitioning tool shows of the first two partitions of a disk; other disks have none.
     void Show(const std::string &disk, const TAVOPARTPLACE &first, const TAVOPARTPLACE &second)
@@ -80,15 +74,10 @@ TEST_F(Partitions, EveryLayoutIsRecognisedAndNothingElse)
         other.cSector -= 1;
         EXPECT_EQ(check(layout.place1, other, raid), -1);
     }
+    // The RAID layout of version 1 has other sectors.
     Show("sda", {63, 273042, 0xFD}, {273105, 787185, 0xFD});
-    EXPECT_EQ(BlTAVOCheckPartitionLayout("sda", 1, nullptr), 0) << "the RAID layout of version 1 has other sectors";
-    EXPECT_EQ(BlTAVOCheckPartitionLayout(nullptr, 1, nullptr), 0);
-    EXPECT_EQ(log_.Take(), "");
-    commands_.Clear();
-    EXPECT_EQ(BlTAVOCheckPartitionLayout("sdb", 1, nullptr), 0);
-    EXPECT_THAT(commands_.Take(), ElementsAre("/sbin/sfdisk -l -uS -N1 /dev/sdb"));
-    EXPECT_EQ(log_.Lines().at(0).priority, LOG_DEBUG);
-    EXPECT_EQ(log_.Take(), "partition_check_layout:# sdb: dont contain partition [1]");
+    for (const char *disk : {"sda", static_cast<const char *>(nullptr), "sdb"})
+        TELL(BlTAVOCheckPartitionLayout(disk, 1, nullptr));
 }
 
 TEST_F(Partitions, ConfigsAreTheToolsAnswer)
@@ -97,45 +86,39 @@ TEST_F(Partitions, ConfigsAreTheToolsAnswer)
     commands_.Print({{query, "/dev/sda3 9437184 11721045167 11711607984 fd Linux\nsecond line\n"}});
     int64_t start = 0;
     uint32_t type = 0;
-    EXPECT_EQ(RCPartitionConfigs(3, "/dev/sda", &start, &type), 11711607984);
+    TELL(RCPartitionConfigs(3, "/dev/sda", &start, &type));
     EXPECT_EQ(start, 9437184);
     EXPECT_EQ(type, 0xFDu);
-    EXPECT_EQ(RCPartitionConfigs(3, "sda", nullptr, nullptr), 11711607984);
-    EXPECT_THAT(commands_.Take(), ElementsAre(query, query));
+    TELL(RCPartitionConfigs(3, "sda", nullptr, nullptr));
     start = 5;
-    EXPECT_EQ(RCPartitionConfigs(0, "sda", &start, &type), -1);
-    EXPECT_EQ(RCPartitionConfigs(-1, "sda", &start, &type), -1);
-    EXPECT_EQ(RCPartitionConfigs(1, nullptr, &start, &type), -1);
-    EXPECT_THAT(commands_.Take(), IsEmpty());
+    TELL(RCPartitionConfigs(0, "sda", &start, &type));
+    TELL(RCPartitionConfigs(-1, "sda", &start, &type));
+    TELL(RCPartitionConfigs(1, nullptr, &start, &type));
     for (const char *output : {"", "\n", "sfdisk: no such disk\n", "/dev/sda1 1 1 1\n"}) {
         commands_.Print({{query, output}});
-        EXPECT_EQ(RCPartitionConfigs(3, "sda", &start, &type), -1) << output;
+        TELL(RCPartitionConfigs(3, "sda", &start, &type));
     }
     EXPECT_EQ(start, 5);
 }
 
 TEST_F(Partitions, VersionOfTheSystem)
 {
-    Model("supportraid=\"yes\"\nmaxdisks=\"2\"\n");
     int version = 0;
-    EXPECT_EQ(PartitionLayoutGet(&version), 0);
-    EXPECT_EQ(version, 7) << "nothing is recognised";
-    EXPECT_THAT(commands_.Take(), ElementsAre("/sbin/sfdisk -l -uS -N1 /dev/sda", "/sbin/sfdisk -l -uS -N1 /dev/sdb"));
-
+    const auto get = [&] {
+        TELL(PartitionLayoutGet(&version));
+        story_.Show("version", version);
+    };
+    Model("supportraid=\"yes\"\nmaxdisks=\"2\"\n");
+    get();  // nothing is recognised
     Show("sdc", grgAllTavoPartLayout[8].place1, grgAllTavoPartLayout[8].place2);
     for (const char *member : {"sda1", "sdc1", "sdd1"})
         tree_.Put(std::string("/sys/block/md0/md/dev-") + member + "/state", "in_sync\n");
-    EXPECT_EQ(PartitionLayoutGet(&version), 0);
-    EXPECT_EQ(version, 6);
-    EXPECT_THAT(commands_.Take(), ElementsAre("/sbin/sfdisk -l -uS -N1 /dev/sda", "/sbin/sfdisk -l -uS -N1 /dev/sdc",
-                                              "/sbin/sfdisk -l -uS -N2 /dev/sdc"));
+    get();
     tree_.Remove("/sys/block/md0");
-
     Model("supportraid=\"no\"\nmaxdisks=\"4\"\n");
     Show("sdd", grgAllTavoPartLayout[2].place1, grgAllTavoPartLayout[2].place2);
-    EXPECT_EQ(PartitionLayoutGet(&version), 0);
-    EXPECT_EQ(version, 3);
-    EXPECT_EQ(PartitionLayoutGet(nullptr), -1);
+    get();
+    TELL(PartitionLayoutGet(nullptr));
 }
 
 TEST_F(Partitions, CreateRunsExactlyTheseCommands)
@@ -144,163 +127,85 @@ TEST_F(Partitions, CreateRunsExactlyTheseCommands)
     const int version_7 = 7;
     const int version_4 = 4;
     Model("supportraid=\"yes\"\n");
-    EXPECT_EQ(PartitionCreate("/dev/sda", PARTITION_SYSTEM, &version_7), 0);
-    EXPECT_EQ(PartitionCreate("/dev/sda", PARTITION_DATA, &version_7), 0);
-    EXPECT_THAT(commands_.Take(),
-                ElementsAre(Quiet("/sbin/sfdisk -M1 /dev/sda"),
-                            Quiet("/sbin/sfdisk -N1 -uS -q -f -j256 -z4980480 -tfd -F /dev/sda"),
-                            Quiet("/sbin/sfdisk -N2 -uS -q -f -j0 -z4194304 -tfd -F /dev/sda"),
-                            "/sbin/sfdisk -N3 -uS -q -f -j262144 -z-1 -tfd -F /dev/sda >/dev/null 2>&1"));
+    TELL(PartitionCreate("/dev/sda", PARTITION_SYSTEM, &version_7));
+    TELL(PartitionCreate("/dev/sda", PARTITION_DATA, &version_7));
     Model("supportraid=\"no\"\n");
-    EXPECT_EQ(PartitionCreate("/dev/sdab", PARTITION_SYSTEM, &version_1), 0);
-    EXPECT_EQ(PartitionCreate("/dev/sdab", PARTITION_SYSTEM | PARTITION_DATA, &version_1), 0)
-        << "the data partition alone";
-    EXPECT_THAT(commands_.Take(),
-                ElementsAre(Quiet("/sbin/sfdisk -M1 /dev/sdab"),
-                            Quiet("/sbin/sfdisk -N1 -uS -q -f -j63 -z273042 -t83 -F /dev/sdab"),
-                            Quiet("/sbin/sfdisk -N2 -uS -q -f -j0 -z787185 -t82 -F /dev/sdab"),
-                            "/sbin/sfdisk -N3 -uS -q -f -j273042 -z-1 -t83 -F /dev/sdab >/dev/null 2>&1"));
-    EXPECT_EQ(log_.Take(), "");
-    EXPECT_EQ(PartitionCreate("/dev/sda", PARTITION_SYSTEM, &version_4), -1);
-    EXPECT_EQ(PartitionCreate("/dev/sda", 0, &version_7), 0) << "nothing to do";
-    EXPECT_EQ(PartitionCreate(nullptr, PARTITION_DATA, &version_7), -1);
-    EXPECT_THAT(commands_.Take(), IsEmpty());
-    EXPECT_EQ(log_.Take(), "partition_create:# Failed to get partition layout: version=4\n"
-                           "partition_create:# Bad parameters");
-}
-
-TEST_F(Partitions, CreateStopsAtTheFirstFailure)
-{
+    TELL(PartitionCreate("/dev/sdab", PARTITION_SYSTEM, &version_1));
+    TELL(PartitionCreate("/dev/sdab", PARTITION_SYSTEM | PARTITION_DATA, &version_1));  // the data partition alone
+    TELL(PartitionCreate("/dev/sda", PARTITION_SYSTEM, &version_4));
+    TELL(PartitionCreate("/dev/sda", 0, &version_7));
+    TELL(PartitionCreate(nullptr, PARTITION_DATA, &version_7));
     Model("supportraid=\"yes\"\n");
-    const int version = 7;
-    const struct {
-        const char *fails;
-        size_t commands;
-        const char *log;
-    } rows[] = {
-        {"-M1", 1, "partition_add_table:# Failed to add ms-dos signature to /dev/sda, err=3"},
-        {"-N1", 2, "partition_create:# Failed to do '/sbin/sfdisk -N1 "},
-        {"-N2", 3, "partition_create:# Failed to do '/sbin/sfdisk -N2 "},
-    };
-    for (const auto &row : rows) {
-        commands_.Fail(row.fails, 3);
-        EXPECT_EQ(PartitionCreate("/dev/sda", PARTITION_SYSTEM, &version), -1) << row.fails;
-        EXPECT_EQ(commands_.Take().size(), row.commands) << row.fails;
-        EXPECT_THAT(log_.Take(), testing::AllOf(testing::StartsWith(row.log), testing::EndsWith(", err=3")));
+    for (const char *failing : {"-M1", "-N1", "-N2", "-N3"}) {
+        commands_.Fail(failing, 3);
+        story_.Head(failing + std::string(" fails"));
+        TELL(PartitionCreate("/dev/sda", PARTITION_SYSTEM, &version_7));
+        TELL(PartitionCreate("/dev/sda", PARTITION_DATA, &version_7));
     }
 }
 
 TEST_F(Partitions, CleanRunsExactlyTheseCommands)
 {
-    const auto removed = [](int number) {
-        return Quiet("/sbin/sfdisk -N" + std::to_string(number) + " -q -f --no-reread -o0 -z0 -t0 -F -D /dev/sdb");
-    };
-    EXPECT_EQ(PartitionClean("/dev/sdb", PARTITION_DATA), 0);
-    std::vector<std::string> expected;
-    for (int number = 15; number >= 3; --number)
-        expected.push_back(removed(number));
-    expected.push_back(Quiet("/sbin/mdadm --zero-superblock /dev/sdb3"));
-    EXPECT_EQ(commands_.Take(), expected);
-
-    EXPECT_EQ(PartitionClean("/dev/sdb", PARTITION_SYSTEM), 0);
-    const std::string table = Quiet("/sbin/sfdisk -M1 /dev/sdb");
-    EXPECT_THAT(commands_.Take(), ElementsAre(Quiet("/sbin/mdadm --zero-superblock /dev/sdb1"), removed(1), table,
-                                              Quiet("/sbin/mdadm --zero-superblock /dev/sdb2"), removed(2), table));
-    EXPECT_EQ(log_.Take(), "");
-
-    commands_.Fail("-D");
-    EXPECT_EQ(PartitionClean("/dev/sdb", PARTITION_DATA), 0) << "an entry that is not there is no failure";
-    ASSERT_EQ(log_.Lines().size(), 13u);
-    EXPECT_EQ(log_.Lines()[0].priority, LOG_DEBUG);
-    EXPECT_THAT(log_.Take(), testing::StartsWith("partition_clean:# Failed to do '/sbin/sfdisk -N15 "));
+    TELL(PartitionClean("/dev/sdb", PARTITION_DATA));
+    TELL(PartitionClean("/dev/sdb", PARTITION_SYSTEM));
+    commands_.Fail("-D");  // an entry that is not there is not a failure
+    TELL(PartitionClean("/dev/sdb", PARTITION_DATA));
     commands_.Fail("-M1");
-    commands_.Clear();
-    EXPECT_EQ(PartitionClean("/dev/sdb", PARTITION_SYSTEM), -1);
-    EXPECT_EQ(commands_.Take().size(), 3u);
-    EXPECT_EQ(PartitionCleanRAID("/dev/sdb", 0), -1);
+    TELL(PartitionClean("/dev/sdb", PARTITION_SYSTEM));
+    TELL(PartitionCleanRAID("/dev/sdb", 0));
 }
 
 TEST_F(Partitions, RefusesToCleanPartitionsInUse)
 {
     const int version = 7;
-    const struct {
-        const char *busy;  // opened by the kernel itself
-        const char *held;  // has a holder
-        int clean_data, clean_system, create_data, create_system;
-        const char *log;
-    } rows[] = {
-        {"sdb1", "", 0, -1, 0, -1, "/dev/sdb1 is in use: a file system or swap"},
-        {"", "sdb2/holders/md1", 0, -1, 0, -1, "/dev/sdb2 is in use: md1"},
-        {"", "sdb3/holders/md2", -1, -1, -1, -1, "/dev/sdb3 is in use: md2"},
-        {"sdb5", "", -1, -1, 0, -1, "/dev/sdb5 is in use: a file system or swap"},
-        {"sdb", "", -1, -1, -1, -1, "/dev/sdb is in use: a file system or swap"},
-        {"", "sdb/holders/md9", -1, -1, -1, -1, "/dev/sdb is in use: md9"},
-        {"sdc1", "sdc3/holders/md2", 0, 0, 0, 0, ""},
+    const std::pair<const char *, const char *> rows[] = {
+        // opened by the kernel itself, has a holder
+        {"sdb1", ""}, {"", "sdb2/holders/md1"}, {"", "sdb3/holders/md2"},     {"sdb5", ""},
+        {"sdb", ""},  {"", "sdb/holders/md9"},  {"sdc1", "sdc3/holders/md2"},
     };
     for (const auto &row : rows) {
+        const std::string busy = row.first;
+        const std::string held = row.second;
         for (const char *name : {"sdb", "sdb1", "sdb2", "sdb3", "sdb5"})
             tree_.Remove(std::string("/dev/") + name + test::DeviceTree::kBusy);
         tree_.Remove("/sys/class/block");
-        if (*row.busy)
-            tree_.AddBusy(std::string("/dev/") + row.busy);
-        if (std::string(row.busy).size() == 4)
-            tree_.AddBusy("/dev/" + std::string(row.busy, 3));  // as the kernel has it for the whole of such a disk
-        if (*row.held)
-            tree_.Put(std::string("/sys/class/block/") + row.held, "");
-        const std::pair<std::function<int()>, int> calls[] = {
-            {[] { return PartitionClean("/dev/sdb", PARTITION_DATA); }, row.clean_data},
-            {[] { return PartitionClean("/dev/sdb", PARTITION_SYSTEM); }, row.clean_system},
-            {[&] { return PartitionCreate("/dev/sdb", PARTITION_DATA, &version); }, row.create_data},
-            {[&] { return PartitionCreate("/dev/sdb", PARTITION_SYSTEM, &version); }, row.create_system},
-        };
-        for (const auto &[call, result] : calls) {
-            EXPECT_EQ(call(), result) << row.busy << row.held;
-            EXPECT_EQ(commands_.Take().empty(), result == -1);
-            EXPECT_EQ(log_.Lines().size(), result == -1 ? 1u : 0u);
-            EXPECT_THAT(log_.Take(), HasSubstr(result == -1 ? row.log : ""));
-        }
+        if (!busy.empty())
+            tree_.AddBusy("/dev/" + busy);
+        if (busy.size() == 4)
+            tree_.AddBusy("/dev/" + busy.substr(0, 3));  // as the kernel has it for the whole of such a disk
+        if (!held.empty())
+            tree_.Put("/sys/class/block/" + held, "");
+        story_.Head("in use: " + busy + held);
+        TELL(PartitionClean("/dev/sdb", PARTITION_DATA));
+        TELL(PartitionClean("/dev/sdb", PARTITION_SYSTEM));
+        TELL(PartitionCreate("/dev/sdb", PARTITION_DATA, &version));
+        TELL(PartitionCreate("/dev/sdb", PARTITION_SYSTEM, &version));
     }
 }
 
 TEST_F(Partitions, SuperblocksThatTheCommandsWouldMissAreErasedFirst)
 {
-    const auto examine = [](const std::string &name) {
-        return "/sbin/mdadm -E /dev/" + name + " 2>/dev/null";
-    };
     const std::string superblock(test::Capture("mdadm_E_1.2_raid5-mdadm-4.2"));
     PutNodes({"sdb1", "sdb2", "sdb3", "sdb5", "sdb6"});
-    commands_.Print({{examine("sdb2"), superblock}, {examine("sdb6"), superblock}});
-    EXPECT_EQ(PartitionClean("/dev/sdb", PARTITION_SYSTEM | PARTITION_DATA), 0);
-    std::vector<std::string> commands = commands_.Take();
-    commands.resize(6);
-    EXPECT_THAT(commands,
-                ElementsAre(examine("sdb2"), Quiet("/sbin/mdadm --zero-superblock /dev/sdb2"), examine("sdb5"),
-                            examine("sdb6"), Quiet("/sbin/mdadm --zero-superblock /dev/sdb6"),
-                            Quiet("/sbin/sfdisk -N15 -q -f --no-reread -o0 -z0 -t0 -F -D /dev/sdb")));
-    commands_.Print({{examine("sdb2"), superblock}}, 1);
-    EXPECT_EQ(PartitionClean("/dev/sdb", PARTITION_SYSTEM), -1) << "it cannot be erased";
-    EXPECT_EQ(commands_.Take().size(), 2u);
+    commands_.Print(
+        {{"/sbin/mdadm -E /dev/sdb2 2>/dev/null", superblock}, {"/sbin/mdadm -E /dev/sdb6 2>/dev/null", superblock}});
+    TELL(PartitionClean("/dev/sdb", PARTITION_SYSTEM | PARTITION_DATA));
+    commands_.Print({{"/sbin/mdadm -E /dev/sdb2 2>/dev/null", superblock}}, 1);
+    TELL(PartitionClean("/dev/sdb", PARTITION_SYSTEM));  // it cannot be erased
 }
 
 TEST_F(Partitions, ExtendedIsOneTypeAlone)
 {
-    const struct {
-        const char *path;
-        uint32_t type;
-        int extended;
-    } rows[] = {{"/dev/sda4", 0x0F, 1},
-                {"/dev/sda4", 0x05, 0},
-                {"/dev/sda4", 0x85, 0},
-                {"/dev/sda", 0x0F, 0},
-                {"sdab2", 0x0F, 1}};
+    const std::pair<const char *, uint32_t> rows[] = {
+        {"/dev/sda4", 0x0F}, {"/dev/sda4", 0x05}, {"/dev/sda4", 0x85}, {"/dev/sda", 0x0F}, {"sdab2", 0x0F}};
     for (const auto &row : rows) {
         commands_.OnCommand([&](const std::string &) -> test::CommandReply {
-            return {0, SfdiskLine({1, 1, row.type})};
+            return {0, SfdiskLine({1, 1, row.second})};
         });
-        EXPECT_EQ(PartitionIsExtended(row.path), row.extended) << row.path << " " << row.type;
+        story_.Head(row.first + std::string(" of type ") + std::to_string(row.second));
+        TELL(PartitionIsExtended(row.first));
     }
-    EXPECT_EQ(commands_.Take().back(), "/sbin/sfdisk -l -uS -N2 /dev/sdab");
-    EXPECT_EQ(PartitionIsExtended(nullptr), 0);
+    TELL(PartitionIsExtended(nullptr));
 }
 
 TEST_F(Partitions, KindOfTable)
@@ -309,64 +214,51 @@ TEST_F(Partitions, KindOfTable)
     sector[510] = '\x55', sector[511] = '\xAA', sector[450] = '\xEE';
     tree_.Put("/dev/sda", sector);
     int kind = 0;
-    EXPECT_EQ(PartitionTableTypeGet("/dev/sda", &kind), 0);
+    TELL(PartitionTableTypeGet("/dev/sda", &kind));
     EXPECT_EQ(kind, PARTITION_TABLE_GPT);
-    EXPECT_EQ(log_.Lines().at(0).priority, LOG_ERR);
     tree_.Put("/dev/sda", "short");
-    EXPECT_EQ(PartitionTableTypeGet("/dev/sda", &kind), -1);
-    EXPECT_EQ(PartitionTableTypeGet("/dev/sdz", &kind), -1);
+    TELL(PartitionTableTypeGet("/dev/sda", &kind));
+    TELL(PartitionTableTypeGet("/dev/sdz", &kind));
     EXPECT_EQ(kind, PARTITION_TABLE_GPT);
-    const std::string failed = "\npartition_table_type_get:# TAVOReadOneSectorFromDev failed. szDevPath=";
-    EXPECT_EQ(log_.Take(), "partition_table_type_get:# pTable 3" + failed + "[/dev/sda], errno=[0x0A00]" + failed +
-                               "[/dev/sdz], errno=[0x0900]");
 }
 
 TEST_F(Partitions, Paths)
 {
     tree_.Put("/proc/partitions", test::Capture("proc_partitions_md_lvm-linux-6.1-armmp-lpae"));
     Model("");
-    int count = 0;
-    const auto list_of = [&](const char *prefix, int containers, std::vector<std::string> begin = {}) {
+    const auto enumerate = [&](const char *prefix, int containers, const std::vector<std::string> &begin = {}) {
         test::List list = test::MakeList(begin);
         const PARTITIONFILTER filter = {prefix, containers};
-        count = test::Moving(list, [&](auto **addr) { return PartitionPathEnum(&filter, addr); });
-        EXPECT_TRUE(count == list->nItem || count == -1) << count;
-        return test::Items(list.get());
+        TELL(test::Moving(list, [&](auto **addr) { return PartitionPathEnum(&filter, addr); }));
+        story_.Show("paths", test::Items(list.get()));
     };
-    EXPECT_THAT(list_of("sdf", 0, {"/dev/zero", "/dev/a"}),
-                ElementsAre("/dev/a", "/dev/sdf", "/dev/sdf1", "/dev/sdf2", "/dev/zero"));
-    EXPECT_EQ(list_of(nullptr, 0).size(), 29u) << "the heading is no partition";
-    EXPECT_EQ(list_of("", 0).size(), 29u);
-    EXPECT_THAT(list_of("md", 1), IsEmpty());
-    EXPECT_THAT(log_.Take(), HasSubstr("partition_path_enum:# Failed to parsing device: md0"));
-    EXPECT_EQ(list_of(nullptr, 1).size(), 23u);
-    log_.Take();
+    enumerate("sdf", 0, {"/dev/zero", "/dev/a"});
+    enumerate(nullptr, 0);  // the heading is not a partition
+    enumerate("", 0);
+    enumerate("md", 1);
+    enumerate(nullptr, 1);
     tree_.Put("/proc/partitions", "");
-    EXPECT_THAT(list_of(nullptr, 0), IsEmpty());
-    EXPECT_EQ(count, -1);
-    EXPECT_EQ(log_.Take(), "partition_path_enum:# There's no line in /proc/partitions");
-    tree_.Put("/proc/partitions", "8 0 5 sda x\n   8 0 5 sdb");
-    EXPECT_THAT(list_of(nullptr, 0), ElementsAre("/dev/sdb")) << "also without a newline at its end";
-    EXPECT_EQ(log_.Take(), "partition_path_enum:# Unexpected line: [8 0 5 sda x\\x0A]. Counts of token is [5]");
+    enumerate(nullptr, 0);
+    tree_.Put("/proc/partitions", "8 0 5 sda x\n   8 0 5 sdb");  // also without a newline at its end
+    enumerate(nullptr, 0);
 }
 
 TEST_F(Partitions, SpecialDevices)
 {
-    const struct {
-        const char *vendor, *product;
-        int partition;
-    } rows[] = {{"05ac", "1201", 2},  {"05ac", "1300", 0},  {"05ac", "120a", 2}, {"05ac", "1260", 2},
-                {"05ac", "1261", -1}, {"0781", "1201", -1}, {"", "1201", -1}};
+    const std::pair<const char *, const char *> rows[] = {{"05ac", "1201"}, {"05ac", "1300"}, {"05ac", "120a"},
+                                                          {"05ac", "1260"}, {"05ac", "1261"}, {"0781", "1201"},
+                                                          {"", "1201"}};
     const std::string usb = "/sys/devices/usb1/1-1/";
     tree_.Put(usb + "1-1:1.0/host6/target6:0:0/6:0:0:0/model", "x\n");
     tree_.Link("/sys/block/sdq/device", "../../devices/usb1/1-1/1-1:1.0/host6/target6:0:0/6:0:0:0");
     for (const auto &row : rows) {
-        tree_.Put(usb + "idVendor", std::string(row.vendor) + "\n");
-        tree_.Put(usb + "idProduct", std::string(row.product) + "\n");
-        EXPECT_EQ(TAVOCheckSpecialDevice("/dev/sdq"), row.partition) << row.product;
-        EXPECT_EQ(TAVOCheckSpecialDevice("sdq1"), row.partition) << row.product;
+        tree_.Put(usb + "idVendor", std::string(row.first) + "\n");
+        tree_.Put(usb + "idProduct", std::string(row.second) + "\n");
+        story_.Head(row.first + std::string(":") + row.second);
+        TELL(TAVOCheckSpecialDevice("/dev/sdq"));
+        TELL(TAVOCheckSpecialDevice("sdq1"));
     }
-    EXPECT_EQ(TAVOCheckSpecialDevice("sda"), -1);
+    TELL(TAVOCheckSpecialDevice("sda"));
 }
 
 // The real tool, on an image in the place of a disk.
