@@ -19,7 +19,7 @@ constexpr std::string_view byte_order_mark = "\xEF\xBB\xBF";
 
 void CheckColumn(const std::string &column, const std::vector<std::string> &columns)
 {
-    if (std::find(columns.begin(), columns.end(), column) == columns.end())
+    if (!Contains(columns, column))
         Refuse("there is no field \"" + column + "\"");
 }
 

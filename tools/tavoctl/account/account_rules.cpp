@@ -67,9 +67,7 @@ void RefuseTooMany(int additions, const std::string &attempted)
 EntryFailures DeleteAll(const std::vector<std::string> &names, int (*remove)(const char *const *, int),
                         bool (*is_there)(const std::string &), const std::string &noun)
 {
-    std::vector<const char *> texts;
-    for (const std::string &name : names)
-        texts.push_back(name.c_str());
+    const std::vector<const char *> texts = Mapped(names, &std::string::c_str);
     Must(remove(texts.data(), static_cast<int>(texts.size())) == 0,
          "delete the " + noun + (names.size() > 1 ? "s " : " ") + SomeOf(names));
     EntryFailures failures;

@@ -66,10 +66,7 @@ struct GroupKind {
 // As the user's name is written, whatever the case of the argument.
 std::vector<std::string> ExistingUsers(const std::string &list)
 {
-    std::vector<std::string> names = SplitNames(list);
-    for (std::string &name : names)
-        name = ReadUser(name).name;
-    return names;
+    return Mapped(SplitNames(list), [](const std::string &name) { return ReadUser(name).name; });
 }
 
 bool SameName(const std::string &a, const std::string &b)
@@ -208,8 +205,7 @@ GroupPlan PlanGroups(Call &call, const std::string &path, bool update, const std
         if (const std::string *text = row.Find("description"))
             group.description = *text;
         if (const std::string *text = row.Find("members")) {
-            std::vector<std::string> members = SplitNames(*text);
-            std::transform(members.begin(), members.end(), members.begin(), member_name);
+            std::vector<std::string> members = Mapped(SplitNames(*text), member_name);
             // Their order means nothing, and no list has the strangers.
             const std::vector<std::string> users = old ? GroupMembers(old->name) : std::vector<std::string>();
             if (!std::is_permutation(members.begin(), members.end(), users.begin(), users.end()))

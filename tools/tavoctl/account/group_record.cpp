@@ -8,7 +8,6 @@
 #include "frame/text.h"
 
 #include <algorithm>
-#include <sstream>
 
 #include <strings.h>
 
@@ -128,11 +127,8 @@ void RefuseTakenGroupId(const std::string &name, int gid)
 
 std::vector<std::string> SplitNames(const std::string &text)
 {
-    std::vector<std::string> names;
-    std::istringstream in(text);
-    for (std::string name; std::getline(in, name, ',');)
-        if (!name.empty())
-            names.push_back(name);
+    std::vector<std::string> names = Split(text, ',');
+    std::erase(names, "");
     return names;
 }
 
@@ -140,9 +136,7 @@ std::vector<std::string> StrangersOf(const Group &group)
 {
     const std::optional<Group> stored = FindGroup(group.name);
     std::vector<std::string> strangers = stored ? stored->members : std::vector<std::string>();
-    std::erase_if(strangers, [&](const std::string &name) {
-        return std::find(group.members.begin(), group.members.end(), name) != group.members.end();
-    });
+    std::erase_if(strangers, [&](const std::string &name) { return Contains(group.members, name); });
     return strangers;
 }
 

@@ -24,10 +24,7 @@ const ErrorCode *Understood(const std::string &text)
 
 std::vector<std::string> ErrorNames()
 {
-    std::vector<std::string> names;
-    for (const ErrorCode &row : ErrorCodes())
-        names.emplace_back(row.name);
-    return names;
+    return Mapped<std::string>(ErrorCodes(), &ErrorCode::name);
 }
 
 constexpr ArgumentKind error_code = {.name = "code", .candidates = ErrorNames, .sample = "ERR_NO_SUCH_CODE"};

@@ -7,8 +7,6 @@
 #include "frame/program_run.h"
 #include "frame/text.h"
 
-#include <sstream>
-
 namespace tavoctl {
 namespace {
 
@@ -28,10 +26,7 @@ std::vector<TLIBLOCKFILE> Locks()
 
 std::vector<std::string> LockNames()
 {
-    std::vector<std::string> names;
-    for (const TLIBLOCKFILE &lock : Locks())
-        names.push_back(LockName(lock.szPath));
-    return names;
+    return Mapped(Locks(), [](const TLIBLOCKFILE &lock) { return LockName(lock.szPath); });
 }
 
 constexpr ArgumentKind lock_kind = {.name = "lock", .candidates = LockNames, .sample = "tavoinfo"};
@@ -62,8 +57,7 @@ Action LockRun(Arguments &in)
     const auto program = in.Program();
     return [=](Call &call) {
         unsigned mask = 0;
-        std::istringstream words(*locks);
-        for (std::string word; std::getline(words, word, ',');)
+        for (const std::string &word : Split(*locks, ','))
             mask |= MaskOf(word);
         RefuseIf(!mask, "take a lock", "none was named", "tavoctl lock list shows them");
         const HeldLocks held(mask, *shared, timeout->value_or(usual_wait));

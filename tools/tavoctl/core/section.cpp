@@ -6,8 +6,6 @@
 #include "frame/settings_file.h"
 #include "frame/text.h"
 
-#include <algorithm>
-
 namespace tavoctl {
 namespace {
 
@@ -17,14 +15,11 @@ struct SectionName {
 
 constexpr Column<SectionName> section_names[] = {{"section", field<&SectionName::section>}};
 
-struct SectionPair {
-    std::string key;
-    std::string value;
-};
+using SectionPair = std::pair<std::string, std::string>;
 
 constexpr Column<SectionPair> section_pairs[] = {
-    {"key", field<&SectionPair::key>},
-    {"value", field<&SectionPair::value>},
+    {"key", field<&SectionPair::first>},
+    {"value", field<&SectionPair::second>},
 };
 
 struct SectionValue {
@@ -58,7 +53,7 @@ void RequireSection(const SettingsFile &file, const char *path, const std::strin
                     const std::string &attempted)
 {
     const std::vector<std::string> names = Sections(file, path);
-    if (std::find(names.begin(), names.end(), section) == names.end())
+    if (!Contains(names, section))
         throw NotFound(attempted, ERR_SECTION_NOT_FOUND,
                        DidYouMean(section, names, "tavoctl section list shows what is there"));
 }
@@ -75,10 +70,8 @@ Action SectionList(Arguments &in)
 {
     const auto file = SettingsFile::Any(in, reads);
     return [=](Call &call) {
-        std::vector<SectionName> names;
-        for (std::string &name : Sections(file, file.Path().c_str()))
-            names.push_back({std::move(name)});
-        call.List(section_names, names);
+        call.List(section_names, Mapped(Sections(file, file.Path().c_str()),
+                                        [](const std::string &name) { return SectionName{name}; }));
     };
 }
 
@@ -97,12 +90,8 @@ Action SectionGet(Arguments &in)
         // A section that is missing reads like an empty one.
         if (count == 0)
             RequireSection(file, path.c_str(), *section, attempted);
-        if (!*key) {
-            std::vector<SectionPair> pairs;
-            for (const auto &[name, value] : settings.Pairs())
-                pairs.push_back({name, value});
-            return call.List(section_pairs, pairs);
-        }
+        if (!*key)
+            return call.List(section_pairs, settings.Pairs());
         const char *value = settings.Find(**key);
         if (!value)
             throw NotFound("get " + **key + " from section [" + *section + "] of " + path, ERR_KEY_NOT_FOUND,
@@ -177,8 +166,7 @@ Action SectionAdd(Arguments &in)
             StringList names;
             // An unreadable file may be a missing one, which the next call creates; if not, that call fails.
             TLIBFileEnumSection(path, names.Address());
-            const std::vector<std::string> present = names.Items();
-            if (std::find(present.begin(), present.end(), *section) != present.end())
+            if (Contains(names.Items(), *section))
                 throw Failure{.attempted = attempted, .code = ERR_SECTION_EXISTS};
             StringHash settings;
             SetAll(settings, *pairs);

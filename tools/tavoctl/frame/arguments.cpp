@@ -2,6 +2,7 @@
 #include "frame/arguments.h"
 
 #include "frame/failure.h"
+#include "frame/lists.h"
 #include "frame/text.h"
 
 #include <CLI/CLI.hpp>
@@ -41,7 +42,7 @@ struct Arguments::Parts {
         std::string allowed = text.kind.allowed;
         for (const std::string &choice : text.choices)
             allowed += (allowed.empty() ? "" : ", ") + choice;
-        const bool chosen = text.choices.empty() || std::count(text.choices.begin(), text.choices.end(), word) > 0;
+        const bool chosen = text.choices.empty() || Contains(text.choices, word);
         if (chosen && (!text.kind.valid || text.kind.valid(word)))
             return;
         throw Failure{.attempted = "take " + word + " as " + text.name,
@@ -61,7 +62,7 @@ struct Arguments::Parts {
             if (word == "--")
                 break;
             const std::string name = word.substr(0, word.find('='));
-            if (name.size() > 1 && name[0] == '-' && std::count(names.begin(), names.end(), name) == 0)
+            if (name.size() > 1 && name[0] == '-' && !Contains(names, name))
                 return DidYouMean(name, names, "");
         }
         return "";

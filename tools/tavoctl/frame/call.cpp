@@ -42,7 +42,7 @@ void Call::PrintValue(const std::string &value, const Record &record) const
 
 bool Call::IsWanted(const ColumnFacts &column) const
 {
-    return column.place != in_one || std::count(style.columns.begin(), style.columns.end(), column.name) > 0;
+    return column.place != in_one || Contains(style.columns, column.name);
 }
 
 void Call::Change(const std::string &object, const std::string &column, const Cell &before, const Cell &after)

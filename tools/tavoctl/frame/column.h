@@ -2,6 +2,8 @@
 #ifndef TAVOCTL_COLUMN_H
 #define TAVOCTL_COLUMN_H
 
+#include "frame/lists.h"
+
 #include <concepts>
 #include <cstdint>
 #include <optional>
@@ -125,19 +127,13 @@ inline constexpr Field<member> field = {};
 template <class Record, std::size_t Count>
 std::vector<ColumnFacts> Facts(const Column<Record> (&columns)[Count])
 {
-    std::vector<ColumnFacts> facts;
-    for (const Column<Record> &column : columns)
-        facts.push_back(column.facts);
-    return facts;
+    return Mapped(columns, &Column<Record>::facts);
 }
 
 template <class Record, std::size_t Count>
 std::vector<std::string> Names(const Column<Record> (&columns)[Count])
 {
-    std::vector<std::string> names;
-    for (const Column<Record> &column : columns)
-        names.emplace_back(column.facts.name);
-    return names;
+    return Mapped<std::string>(columns, [](const Column<Record> &column) { return column.facts.name; });
 }
 
 }  // namespace tavoctl

@@ -42,24 +42,17 @@ std::vector<std::string> OfVerb(const Arguments &declared, const std::vector<std
 
 std::vector<std::string> AllOf(const Program &program, const std::vector<std::string> &words)
 {
-    std::vector<std::string> names;
-    if (words.size() == 1) {
-        for (const auto &family : program.Families())
-            names.emplace_back(family->Name());
-        return names;
-    }
+    if (words.size() == 1)
+        return program.FamilyNames();
     const Family *family = program.Find(words[0]);
     if (!family)
-        return names;
+        return {};
     const VerbEntry *only = family->Find("");
-    if (!only && words.size() == 2) {
-        for (const VerbEntry &entry : family->Verbs())
-            names.emplace_back(entry.name);
-        return names;
-    }
+    if (!only && words.size() == 2)
+        return family->VerbNames();
     const VerbEntry *entry = only ? only : family->Find(words[1]);
     if (!entry)
-        return names;
+        return {};
     const ReadyVerb verb(*family, *entry);
     return OfVerb(verb.Declared(), {words.begin() + (only ? 1 : 2), words.end()});
 }

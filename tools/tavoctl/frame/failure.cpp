@@ -35,12 +35,11 @@ constexpr int usage_codes[] = {ERR_BAD_PARAMETERS,      ERR_USAGE,
 
 int StatusOf(int code)
 {
-    const auto is_one_of = [code](const auto &all) { return std::count(std::begin(all), std::end(all), code) > 0; };
-    return is_one_of(absent_codes)     ? exit_not_found
-           : is_one_of(busy_codes)     ? exit_busy
-           : is_one_of(usage_codes)    ? exit_usage
-           : code == ERR_ACCESS_DENIED ? exit_denied
-                                       : exit_failed;
+    return Contains(absent_codes, code)  ? exit_not_found
+           : Contains(busy_codes, code)  ? exit_busy
+           : Contains(usage_codes, code) ? exit_usage
+           : code == ERR_ACCESS_DENIED   ? exit_denied
+                                         : exit_failed;
 }
 
 // Checks for as many descriptors as the library needs at a time. Without them even a free lock cannot be taken.

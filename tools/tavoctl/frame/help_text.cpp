@@ -2,15 +2,13 @@
 #include "frame/program.h"
 #include "frame/text.h"
 
-#include <sstream>
-
 namespace tavoctl {
 
 std::string Program::Help() const
 {
-    std::vector<std::pair<std::string, std::string>> lines;
-    for (const auto &family : families_)
-        lines.emplace_back(family->Name(), family->Purpose());
+    const auto lines = Mapped(families_, [](const auto &family) {
+        return std::pair<std::string, std::string>(family->Name(), family->Purpose());
+    });
     return "usage: tavoctl FAMILY VERB [OPTION]... [ARGUMENT]...\n"
            "Reads and changes the state of this appliance.\n\n" +
            Described(lines) +
@@ -21,9 +19,8 @@ std::string Program::Help() const
 
 std::string FamilyHelp(const Family &family)
 {
-    std::vector<std::pair<std::string, std::string>> lines;
-    for (const VerbEntry &entry : family.Verbs())
-        lines.emplace_back(entry.name, entry.Summary());
+    const auto lines =
+        Mapped(family.Verbs(), [](const VerbEntry &entry) { return std::pair(entry.name, entry.Summary()); });
     return std::string("usage: tavoctl ") + family.Name() + " VERB [OPTION]... [ARGUMENT]...\n" + family.Purpose() +
            "\n\n" + Described(lines);
 }
@@ -36,8 +33,7 @@ std::string VerbHelp(const Family &family, const VerbEntry &entry)
     if (entry.examples.empty())
         return text;
     text += "\nExamples:\n";
-    std::istringstream examples(entry.examples);
-    for (std::string line; std::getline(examples, line);)
+    for (const std::string &line : Split(entry.examples, '\n'))
         text += "  " + line + "\n";
     return text;
 }

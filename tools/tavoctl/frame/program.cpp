@@ -12,7 +12,6 @@
 #include <exception>
 #include <iostream>
 #include <new>
-#include <sstream>
 
 #include <unistd.h>
 
@@ -64,14 +63,12 @@ void PrintReport(const Call &call)
 // The columns that --output names.
 std::vector<std::string> ChosenColumns(const std::string &list, const std::vector<ColumnFacts> &columns)
 {
-    std::vector<std::string> known, chosen;
-    for (const ColumnFacts &column : columns)
-        known.emplace_back(column.name);
-    std::istringstream names(list);
-    for (std::string name; std::getline(names, name, ',');) {
+    const auto known = Mapped<std::string>(columns, &ColumnFacts::name);
+    std::vector<std::string> chosen;
+    for (std::string &name : Split(list, ',')) {
         for (char &c : name)
             c = c == ' ' ? '_' : static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
-        if (std::count(known.begin(), known.end(), name) == 0)
+        if (!Contains(known, name))
             throw UsageFailure("take " + name + " as --output", "there is no such column",
                                DidYouMean(name, known, "allowed: " + Joined(known, ", ")));
         chosen.push_back(name);
@@ -101,10 +98,7 @@ void Family::Add(const char *name, unsigned traits, Answer answer, Action (*decl
 
 std::vector<std::string> Family::VerbNames() const
 {
-    std::vector<std::string> names;
-    for (const VerbEntry &verb : verbs_)
-        names.push_back(verb.name);
-    return names;
+    return Mapped(verbs_, &VerbEntry::name);
 }
 
 const VerbEntry *Family::Find(const std::string &name) const
@@ -161,6 +155,11 @@ Family &Program::Add(const char *name, const char *purpose)
     return *families_.emplace_back(std::make_unique<Family>(name, purpose));
 }
 
+std::vector<std::string> Program::FamilyNames() const
+{
+    return Mapped<std::string>(families_, &Family::Name);
+}
+
 const Family *Program::Find(const std::string &name) const
 {
     const auto found =
@@ -182,10 +181,7 @@ int Program::Run(std::vector<std::string> words) const
     const Family *family = Find(first);
     if (!family) {
         const std::string reason = first.empty() ? "a family is required" : "there is no family " + first;
-        std::vector<std::string> names;
-        for (const auto &known : families_)
-            names.emplace_back(known->Name());
-        return ReportUsage(reason, DidYouMean(first, names, "see tavoctl --help"));
+        return ReportUsage(reason, DidYouMean(first, FamilyNames(), "see tavoctl --help"));
     }
     if (const VerbEntry *only = family->Find(""))
         return RunVerb(*family, *only, Tail(words, 1));

@@ -71,6 +71,7 @@ class Program {
 
     Family &Add(const char *name, const char *purpose);
     const std::vector<std::unique_ptr<Family>> &Families() const { return families_; }
+    std::vector<std::string> FamilyNames() const;
     const Family *Find(const std::string &name) const;
 
     int Run(std::vector<std::string> words) const;

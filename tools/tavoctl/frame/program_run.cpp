@@ -2,6 +2,7 @@
 #include "frame/program_run.h"
 
 #include "frame/failure.h"
+#include "frame/text.h"
 
 #include <cerrno>
 #include <csignal>
@@ -9,7 +10,6 @@
 #include <cstring>
 #include <filesystem>
 #include <iostream>
-#include <sstream>
 
 #include <spawn.h>
 #include <sys/wait.h>
@@ -94,8 +94,7 @@ std::string FindProgram(const std::string &name)
     if (name.find('/') != std::string::npos)
         return std::filesystem::absolute(name).string();
     const char *path = std::getenv("PATH");
-    std::istringstream folders(path ? path : "/usr/sbin:/usr/bin:/sbin:/bin");
-    for (std::string folder; std::getline(folders, folder, ':');) {
+    for (const std::string &folder : Split(path ? path : "/usr/sbin:/usr/bin:/sbin:/bin", ':')) {
         const std::filesystem::path file = std::filesystem::absolute(folder.empty() ? "." : folder) / name;
         std::error_code ignored;
         if (std::filesystem::is_regular_file(file, ignored) && ::access(file.c_str(), X_OK) == 0)

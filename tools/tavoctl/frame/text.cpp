@@ -92,6 +92,15 @@ std::string Printable(std::string_view text, bool keep_lines)
     return printable;
 }
 
+std::vector<std::string> Split(const std::string &text, char separator)
+{
+    std::vector<std::string> parts;
+    std::istringstream in(text);
+    for (std::string part; std::getline(in, part, separator);)
+        parts.push_back(part);
+    return parts;
+}
+
 std::string Joined(const std::vector<std::string> &texts, const char *separator)
 {
     std::string joined;

@@ -16,6 +16,9 @@ namespace tavoctl {
 // UTF-8, and the invisible characters that change the direction of text. Line feeds too, unless keep_lines.
 std::string Printable(std::string_view text, bool keep_lines = false);
 
+// The parts of a text between separators. A separator at its end begins no further part.
+std::vector<std::string> Split(const std::string &text, char separator);
+
 // The texts with a separator between them.
 std::string Joined(const std::vector<std::string> &texts, const char *separator);
 

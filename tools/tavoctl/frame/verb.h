@@ -112,12 +112,10 @@ struct Call {
     Table TableOf(const Column<Facts_> (&columns)[Count], const std::vector<Facts_> &records) const
     {
         Table table(Facts(columns));
-        for (const Facts_ &record : records) {
-            std::vector<Cell> row;
-            for (const Column<Facts_> &column : columns)
-                row.push_back(IsWanted(column.facts) ? column.read(record) : Cell());
-            table.Add(std::move(row));
-        }
+        for (const Facts_ &record : records)
+            table.Add(Mapped(columns, [&](const Column<Facts_> &column) {
+                return IsWanted(column.facts) ? column.read(record) : Cell();
+            }));
         return table;
     }
 

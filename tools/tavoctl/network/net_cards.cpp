@@ -62,8 +62,7 @@ Action NetIpv6(Arguments &in)
                 Must(TAVONetIPv6Set(name, on) == 0, "switch IPv6 of " + *interface + " " + *what);
             return;
         }
-        const std::vector<std::string> present = Ipv6Of(*interface);
-        const bool has = std::find(present.begin(), present.end(), *what) != present.end();
+        const bool has = Contains(Ipv6Of(*interface), *what);
         // An address that is there may be written in another way: the library knows.
         call.Change(*interface, "ipv6_addresses", *remove ? Cell(*what) : Cell(),
                     *remove || (has && !*gateway) ? Cell() : Cell(*what));

@@ -173,7 +173,7 @@ void TakeCard(const Json &value, const std::string &place, NetDocument &document
     const auto name = NormalInterface(value["name"].get<std::string>());
     if (!name)
         Refuse(place + ".name", "not the name of an interface");
-    if (document.cards.contains(*name) || std::count(document.absent.begin(), document.absent.end(), *name) > 0)
+    if (document.cards.contains(*name) || Contains(document.absent, *name))
         Refuse(place + ".name", "duplicate card " + *name);
     if (value.contains("absent")) {
         if (value["absent"] != true || value.size() != 2)

@@ -31,11 +31,7 @@ Words Fields(const std::string &line)
 
 std::vector<Words> Rows(const std::string &path)
 {
-    std::vector<Words> rows;
-    std::istringstream lines(FileText(path));
-    for (std::string line; std::getline(lines, line);)
-        rows.push_back(Fields(line));
-    return rows;
+    return Mapped(Split(FileText(path), '\n'), Fields);
 }
 
 std::string Attribute(const std::string &interface, const char *name)
@@ -185,12 +181,6 @@ bool IsMember(const std::string &interface)
     return ::access(("/sys/class/net/" + interface + "/master").c_str(), F_OK) == 0;
 }
 
-Words Sorted(Words words)
-{
-    std::sort(words.begin(), words.end());
-    return words;
-}
-
 Words Without(Words words, const std::string &text, char sign, bool wanted)
 {
     std::erase_if(words, [&](const std::string &one) { return (one.find(sign) != one.npos) != wanted || one == text; });
@@ -217,7 +207,7 @@ NetFactsMap StoredCard(const std::string &interface)
     Words ipv6 = Without(more.addresses, "", ':', true);
     if (const std::string one = NetSetting(file, "IPV6ADDR"); !one.empty()) {
         const auto both = NormalIpv6Card(one + "/" + NetSetting(file, "IPV6PREFIXLENG"));
-        if (both && std::count(ipv6.begin(), ipv6.end(), *both) == 0)
+        if (both && !Contains(ipv6, *both))
             ipv6.push_back(*both);
     }
     card["ipv6_addresses"] = Sorted(ipv6);

@@ -15,7 +15,6 @@
 #include <algorithm>
 #include <csignal>
 #include <functional>
-#include <sstream>
 
 #include <unistd.h>
 
@@ -30,9 +29,8 @@ void Run(const std::string &command, const std::string &attempted)
 
 Words Minus(const Words &all, const Words &others)
 {
-    Words left;
-    std::copy_if(all.begin(), all.end(), std::back_inserter(left),
-                 [&](const std::string &one) { return std::count(others.begin(), others.end(), one) == 0; });
+    Words left = all;
+    std::erase_if(left, [&](const std::string &one) { return Contains(others, one); });
     return left;
 }
 
@@ -234,9 +232,8 @@ class CardSteps {
             for (const std::string &one : Minus(TextsOf(live, "more_addresses"), TextsOf(wanted_, "more_addresses")))
                 if (one != TextOf(wanted_, "address"))
                     Run("/sbin/ip addr del " + one + " dev " + name_, "take " + one + " from " + name_);
-        const Words more = TextsOf(live, "more_addresses");
         const std::string first = TextOf(wanted_, "address");
-        if (std::count(more.begin(), more.end(), first) > 0)
+        if (Contains(TextsOf(live, "more_addresses"), first))
             Run("/sbin/ip addr del " + first + " dev " + name_, "make " + first + " the first address of " + name_);
         if (wanted_.contains("ipv6_addresses"))
             for (const std::string &one : Minus(TextsOf(live, "ipv6_addresses"), TextsOf(wanted_, "ipv6_addresses")))
@@ -350,8 +347,7 @@ void SetGateway(const NetFactsMap &wanted)
 void KeepSearch(const Words &search)
 {
     std::string text = search.empty() ? "" : "search " + Joined(search, " ") + "\n";
-    std::istringstream lines(FileText(resolver_file));
-    for (std::string line; std::getline(lines, line);)
+    for (const std::string &line : Split(FileText(resolver_file), '\n'))
         if (!line.starts_with("search") && !line.starts_with("domain"))
             text += line + "\n";
     if (text != FileText(resolver_file))

@@ -51,10 +51,9 @@ Action ServiceList(Arguments &in)
     return [=](Call &call) {
         const auto look = [&] {
             const OneMoment moment;
-            std::vector<ServiceState> states;
-            for (const std::string &name : NamesToList(*all, *volume))
-                states.push_back(StateOf(FindService(name), moment.Held()));
-            return call.TableOf(service_columns, states);
+            return call.TableOf(service_columns, Mapped(NamesToList(*all, *volume), [&](const std::string &name) {
+                                    return StateOf(FindService(name), moment.Held());
+                                }));
         };
         if (*watch)
             Watch(call, static_cast<int>(interval->value_or(2)), look);

@@ -14,14 +14,6 @@
 namespace tavoctl {
 namespace {
 
-std::vector<int> FindServices(const std::vector<std::string> &names)
-{
-    std::vector<int> ids;
-    for (const std::string &name : names)
-        ids.push_back(FindService(name));
-    return ids;
-}
-
 // A start-up script ends before its daemon is up, and says nothing of one that dies a moment later.
 void AwaitRunning(int id, int64_t seconds)
 {
@@ -113,7 +105,7 @@ Action SwitchServices(Arguments &in)
     if (action.binds)
         force = in.Flag("--force", "also when the volume of its data is not mounted");
     return [=](Call &call) {
-        const std::vector<int> ids = FindServices(*names);
+        const std::vector<int> ids = Mapped(*names, FindService);
         if (action.binds && !*force)
             std::for_each(ids.begin(), ids.end(), RequireVolumes);
         std::vector<bool> differs;
@@ -150,7 +142,7 @@ Action ServiceReload(Arguments &in)
 {
     const auto names = in.Texts("SERVICE", service_kind, service_help);
     return [=](Call &call) {
-        const std::vector<int> ids = FindServices(*names);
+        const std::vector<int> ids = Mapped(*names, FindService);
         for (const std::string &name : *names)
             call.Change("service " + name, "settings", {}, "read again");
         if (!call.Proceed())

@@ -36,7 +36,7 @@ void AddFolders(ServiceState &state)
         state.bound = there && state.bound.value_or(true);
         state.shares.emplace_back(share.szShareName);
         const std::string volume = share.szVolumePath;
-        if (!volume.empty() && std::find(state.volumes.begin(), state.volumes.end(), volume) == state.volumes.end())
+        if (!volume.empty() && !Contains(state.volumes, volume))
             state.volumes.push_back(volume);
     }
 }
@@ -100,16 +100,12 @@ std::vector<int32_t> FoldersOf(int id)
 
 std::vector<std::string> VolumePaths()
 {
-    std::vector<std::string> paths;
-    for (const MountedVolume &volume : MountedVolumes())
-        paths.push_back(volume.path);
-    return paths;
+    return Mapped(MountedVolumes(), &MountedVolume::path);
 }
 
 bool IsMounted(const std::string &volume)
 {
-    const std::vector<std::string> volumes = VolumePaths();
-    return std::find(volumes.begin(), volumes.end(), volume) != volumes.end();
+    return Contains(VolumePaths(), volume);
 }
 
 const ArgumentKind service_kind = {.name = "service", .candidates = ServiceNames, .sample = "no-service"};

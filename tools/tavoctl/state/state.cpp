@@ -6,7 +6,6 @@
 #include "state/state_plan.h"
 
 #include <algorithm>
-#include <sstream>
 
 namespace tavoctl {
 namespace {
@@ -19,17 +18,11 @@ std::vector<std::string> SectionNames()
 // "users,groups"; all of them for "".
 std::optional<Sections> SectionsOf(const std::string &list)
 {
-    const std::vector<std::string> known = SectionNames();
-    if (list.empty())
-        return Sections(known.begin(), known.end());
-    Sections sections;
-    std::istringstream names(list);
-    for (std::string name; std::getline(names, name, ',');) {
-        if (std::find(known.begin(), known.end(), name) == known.end())
-            return {};
-        sections.insert(name);
-    }
-    return sections;
+    const std::vector<std::string> names = list.empty() ? SectionNames() : Split(list, ',');
+    if (std::any_of(names.begin(), names.end(),
+                    [](const std::string &name) { return !Contains(state_sections, name); }))
+        return {};
+    return Sections(names.begin(), names.end());
 }
 
 constexpr ArgumentKind sections_kind = {

@@ -167,7 +167,7 @@ StateJson ParseState(const std::string &text, const Sections &sections)
     for (const auto &[name, value] : document.items()) {
         if (name == "format_version")
             continue;
-        if (std::find(std::begin(state_sections), std::end(state_sections), name) == std::end(state_sections))
+        if (!Contains(state_sections, name))
             RefuseState(name, "there is no such section");
         CheckSection(name, value);
         if (sections.contains(name))

@@ -35,7 +35,7 @@ constexpr int64_t most_kib = int64_t{1} << 40;
 void CheckFields(const StateJson &row, const std::vector<std::string> &known, const std::string &place)
 {
     for (const auto &[name, value] : row.items())
-        if (std::find(known.begin(), known.end(), name) == known.end())
+        if (!Contains(known, name))
             RefuseRow(place + "." + name, "there is no such field");
 }
 

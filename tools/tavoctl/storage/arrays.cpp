@@ -4,6 +4,7 @@
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/files.h"
+#include "frame/lists.h"
 #include "storage/device.h"
 
 #include <algorithm>
@@ -44,10 +45,6 @@ std::string Duration(uint64_t seconds)
         std::snprintf(text, sizeof text, "%u s", static_cast<unsigned>(seconds));
     return text;
 }
-
-}  // namespace
-
-namespace {
 
 constexpr std::string_view array_device = "/dev/md";
 
@@ -121,11 +118,7 @@ std::vector<Array> ReadArrays()
 std::vector<std::string> ArrayNames()
 {
     StringList paths;
-    std::vector<std::string> names;
-    if (RAIDPathEnum(paths.Address()) > 0)
-        for (const std::string &path : paths.Items())
-            names.push_back(DeviceName(path));
-    return names;
+    return RAIDPathEnum(paths.Address()) > 0 ? Mapped(paths.Items(), DeviceName) : std::vector<std::string>();
 }
 
 const char *StatusText(int status)
@@ -164,7 +157,7 @@ std::string MemberOf(const RAIDINFO &info, const std::string &word)
 {
     const std::string path = DevicePath(word);
     const std::vector<std::string> members = Members(info, ~0);
-    if (std::find(members.begin(), members.end(), path) != members.end())
+    if (Contains(members, path))
         return path;
     if (std::isdigit(static_cast<unsigned char>(path.back())))
         return "";

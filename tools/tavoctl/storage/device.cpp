@@ -35,10 +35,7 @@ std::vector<std::string> Names(const PARTITIONFILTER &filter)
     StringList paths;
     if (PartitionPathEnum(&filter, paths.Address()) < 0)
         return {};
-    std::vector<std::string> names;
-    for (const std::string &path : paths.Items())
-        names.push_back(DeviceName(path));
-    return names;
+    return Mapped(paths.Items(), DeviceName);
 }
 
 bool IsDeviceName(const std::string &word)
@@ -93,10 +90,7 @@ std::string DevicePath(const std::string &word)
 
 std::vector<std::string> DevicePaths(const std::vector<std::string> &words)
 {
-    std::vector<std::string> paths;
-    for (const std::string &word : words)
-        paths.push_back(DevicePath(word));
-    return paths;
+    return Mapped(words, DevicePath);
 }
 
 std::string DeviceName(const std::string &path)
@@ -116,10 +110,7 @@ std::string DiskPath(const std::string &word)
 
 std::vector<std::string> DiskPaths(const std::vector<std::string> &words)
 {
-    std::vector<std::string> paths;
-    for (const std::string &word : words)
-        paths.push_back(DiskPath(word));
-    return paths;
+    return Mapped(words, DiskPath);
 }
 
 std::vector<std::string> DiskPaths()

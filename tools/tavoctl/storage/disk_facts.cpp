@@ -66,9 +66,7 @@ DiskFacts DescribeDisk(const std::string &path, bool wake, const std::vector<Arr
 
 std::vector<DiskFacts> AllDisks(bool wake, const std::vector<Array> &arrays)
 {
-    std::vector<DiskFacts> disks;
-    for (const std::string &path : DiskPaths())
-        disks.push_back(DescribeDisk(path, wake, arrays));
+    auto disks = Mapped(DiskPaths(), [&](const std::string &path) { return DescribeDisk(path, wake, arrays); });
     std::vector<DiskFacts> sorted;
     for (int bay = 1; bay <= TAVOMaxDiskGet(); ++bay) {
         if (TAVOEBoxDevIs(bay - 1) == 1)

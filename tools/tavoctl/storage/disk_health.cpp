@@ -120,9 +120,8 @@ Action DiskHealthList(Arguments &in)
     const auto wake = in.Flag("--wake", wake_help);
     return [=](Call &call) {
         const std::vector<std::string> paths = DiskPaths(*words);
-        std::vector<DiskHealth> disks;
-        for (const std::string &path : paths.empty() ? DiskPaths() : paths)
-            disks.push_back(ReadHealth(path, *wake));
+        const auto disks = Mapped(paths.empty() ? DiskPaths() : paths,
+                                  [&](const std::string &path) { return ReadHealth(path, *wake); });
         call.List(health_columns, disks);
         const bool fails =
             std::any_of(disks.begin(), disks.end(), [](const DiskHealth &disk) { return disk.verdict == "failing"; });

@@ -3,6 +3,7 @@
 
 #include "frame/containers.h"
 #include "frame/failure.h"
+#include "frame/lists.h"
 #include "frame/text.h"
 
 #include <cstdio>
@@ -32,10 +33,7 @@ std::vector<MountedVolume> MountedVolumes()
     while (const mntent *mount = ::getmntent(mounts.get()))
         if (const int number = VolumeNumber(mount->mnt_dir); number > 0)
             found[number] = {number, mount->mnt_dir, mount->mnt_fsname};  // the last mount covers the earlier ones
-    std::vector<MountedVolume> volumes;
-    for (auto &[number, volume] : found)
-        volumes.push_back(std::move(volume));
-    return volumes;
+    return Mapped(found, [](const auto &one) { return one.second; });
 }
 
 MountedVolume FindVolume(int number)

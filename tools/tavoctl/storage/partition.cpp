@@ -50,10 +50,8 @@ constexpr Column<LayoutFacts> layout_columns[] = {
     {"gap", [](const LayoutFacts &l) { return static_cast<int64_t>(l.layout.cGap); }, "", in_list, "sectors"},
     {"types",
      [](const LayoutFacts &l) {
-         std::vector<std::string> types;
-         for (const TAVOPARTPLACE &place : {l.layout.place1, l.layout.place2, l.layout.place3})
-             types.push_back(TypeText(place.nType));
-         return types;
+         return std::vector{TypeText(l.layout.place1.nType), TypeText(l.layout.place2.nType),
+                            TypeText(l.layout.place3.nType)};
      },
      "hexadecimal"},
     {"current", field<&LayoutFacts::current>, "new disks get it"},
@@ -130,10 +128,9 @@ Action PartitionLayout(Arguments &in)
             int current = 0;
             Must(PartitionLayoutGet(&current) == 0, attempted);
             const bool raid = LVMIsSupport() == 1;
-            std::vector<LayoutFacts> layouts;
-            for (const TAVOPARTLAYOUT &row : grgAllTavoPartLayout)
-                layouts.push_back({row, row.nVersion == current && (row.fRaid != 0) == raid});
-            return call.List(layout_columns, layouts);
+            return call.List(layout_columns, Mapped(grgAllTavoPartLayout, [=](const TAVOPARTLAYOUT &row) {
+                                 return LayoutFacts{row, row.nVersion == current && (row.fRaid != 0) == raid};
+                             }));
         }
         const std::string path = DiskPath(**disk);
         const std::string attempted = "read the layout of " + path;

@@ -66,13 +66,7 @@ constexpr Column<ArrayFacts> array_columns[] = {
     {"slots", [](const ArrayFacts &a) { return a.info->nSlot; }},
     {"working", [](const ArrayFacts &a) { return a.info->nWorking; }},
     {"failures", [](const ArrayFacts &a) { return a.info->nFailed; }, "how many members have failed"},
-    {"members",
-     [](const ArrayFacts &a) {
-         std::vector<std::string> names;
-         for (const std::string &path : Members(*a.info, ~0))
-             names.push_back(DeviceName(path));
-         return names;
-     }},
+    {"members", [](const ArrayFacts &a) { return Mapped(Members(*a.info, ~0), DeviceName); }},
     {"active", members_in<RAID_MEMBER_ACTIVE>, "paths of members in sync", in_details},
     {"spare", members_in<RAID_MEMBER_SPARE>, "paths of spares, and of members that are being rebuilt", in_details},
     {"failed", members_in<RAID_MEMBER_FAILED>, "paths", in_details},

@@ -16,11 +16,6 @@
 namespace tavoctl {
 namespace {
 
-bool Contains(const std::vector<std::string> &paths, const std::string &path)
-{
-    return std::find(paths.begin(), paths.end(), path) != paths.end();
-}
-
 std::string LossOf(const std::vector<std::string> &paths)
 {
     return "Lose what is on " + Joined(paths, ", ") + "?";

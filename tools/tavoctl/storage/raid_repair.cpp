@@ -163,8 +163,7 @@ std::string OldMember(const RAIDINFO &info, const std::string &word, const std::
     const std::string path = MemberOf(info, word);
     if (path.empty())
         throw NotFound(attempted, ERR_PATH_NOT_FOUND, DevicePath(word) + " is not a member");
-    BusyIf(std::find(active.begin(), active.end(), path) != active.end() && !is_gone(path), attempted,
-           path + " is in sync");
+    BusyIf(Contains(active, path) && !is_gone(path), attempted, path + " is in sync");
     return path;
 }
 

@@ -51,12 +51,9 @@ class Tree {
             if (!shown_.contains(volume.group))
                 AddGroup(volume.group, -1);
         Table table(Facts(node_columns));
-        for (std::size_t i = 0; i < nodes_.size(); ++i) {
-            std::vector<Cell> cells;
-            for (const Column<Node> &column : node_columns)
-                cells.push_back(column.read(nodes_[i]));
-            table.Add(std::move(cells), above_[i]);
-        }
+        for (std::size_t i = 0; i < nodes_.size(); ++i)
+            table.Add(Mapped(node_columns, [&](const Column<Node> &column) { return column.read(nodes_[i]); }),
+                      above_[i]);
         return table;
     }
 
@@ -139,16 +136,17 @@ class Tree {
         const std::string name = DeviceName(array.szPath);
         if (!shown_.insert(name).second)
             return;
-        Node node = {.name = name, .kind = "array", .parents = {}, .size = Bytes{array.cbArray}};
-        for (const std::string &member : Members(array, ~0))
-            node.parents.push_back(DeviceName(member));
+        Node node = {.name = name,
+                     .kind = "array",
+                     .parents = Mapped(Members(array, ~0), DeviceName),
+                     .size = Bytes{array.cbArray}};
         node.state = LevelText(array.fLevel) + " " + StatusText(array.nStatus);
         if (const auto rebuild = RebuildOf(array))
             *node.state += ", " + ActionOf(array) + " " + std::to_string(rebuild->Percent()) + " %";
         LookAt(node, array.szPath);
         const int row = Add(std::move(node), above);
         for (const Volume &volume : volumes_)
-            if (std::count(volume.devices.begin(), volume.devices.end(), name) && !shown_.contains(volume.group))
+            if (Contains(volume.devices, name) && !shown_.contains(volume.group))
                 AddGroup(volume.group, row);
     }
 

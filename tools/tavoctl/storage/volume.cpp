@@ -6,7 +6,6 @@
 #include "storage/volumes.h"
 
 #include <algorithm>
-#include <sstream>
 
 namespace tavoctl {
 namespace {
@@ -73,10 +72,8 @@ Action VolumeCheck(Arguments &in)
             result.state = "damaged";
         else
             throw Failure{.attempted = attempted, .reason = done.Reason()};
-        std::istringstream lines(done.output);
-        for (std::string line; std::getline(lines, line);)
-            if (!line.empty())
-                result.report.push_back(line);
+        result.report = Split(done.output, '\n');
+        std::erase(result.report, "");
         call.One(check_columns, result);
         if (result.state == "damaged")
             call.status = exit_failed;

@@ -45,12 +45,12 @@ void RefuseMounted(const std::string &place, const std::string &attempted)
 // The numbers that pvs prints, in a row for each device.
 std::vector<std::vector<uint64_t>> NumbersOf(const std::string &group, const std::string &attempted)
 {
-    std::istringstream lines(
+    const std::string numbers =
         RunTool({"/sbin/pvs", "--noheadings", "--units", "b", "--nosuffix", "-o",
                  "dev_size,pe_start,pv_pe_count,vg_extent_size,vg_free_count", "-S", "vg_name=" + group},
-                attempted));
+                attempted);
     std::vector<std::vector<uint64_t>> rows;
-    for (std::string line; std::getline(lines, line);) {
+    for (const std::string &line : Split(numbers, '\n')) {
         std::istringstream words(line);
         std::vector<uint64_t> row(5);
         if (words >> row[0] >> row[1] >> row[2] >> row[3] >> row[4] && row[3] > 0)

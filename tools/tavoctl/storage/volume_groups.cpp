@@ -4,9 +4,8 @@
 #include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/files.h"
+#include "frame/lists.h"
 #include "storage/device.h"
-
-#include <algorithm>
 
 namespace tavoctl {
 std::vector<LVMPV> PhysicalVolumes()
@@ -64,8 +63,8 @@ void RefuseUsedGroup(const std::string &path, const std::string &attempted)
 void RefuseGrouped(const std::vector<std::string> &devices, const std::string &attempted)
 {
     for (const LVMPV &pv : PhysicalVolumes())
-        BusyIf(*pv.szVg && std::find(devices.begin(), devices.end(), pv.szPv) != devices.end(), attempted,
-               std::string(pv.szPv) + " belongs to " + pv.szVg, "remove that first");
+        BusyIf(*pv.szVg && Contains(devices, pv.szPv), attempted, std::string(pv.szPv) + " belongs to " + pv.szVg,
+               "remove that first");
 }
 
 }  // namespace tavoctl
