@@ -4,6 +4,7 @@
 #include "tavo_bdb.h"
 
 #include "account/account_rules.h"
+#include "frame/files.h"
 #include "frame/private_copy.h"
 #include "frame/text.h"
 
@@ -108,6 +109,11 @@ std::vector<std::string> SplitFields(const std::string &line)
             return fields;
         at = end + 1;
     }
+}
+
+std::vector<std::vector<std::string>> FieldsIn(const std::string &path)
+{
+    return Mapped(Split(FileText(path), '\n'), SplitFields);
 }
 
 AccountCheck::AccountCheck(std::vector<CheckedFile> files, const char *id_store)

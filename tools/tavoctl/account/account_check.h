@@ -53,6 +53,8 @@ class AccountCheck {
 };
 
 std::vector<std::string> SplitFields(const std::string &line);
+// Those of each line of a file; none where it cannot be read.
+std::vector<std::vector<std::string>> FieldsIn(const std::string &path);
 
 }  // namespace tavoctl
 

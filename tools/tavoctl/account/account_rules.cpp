@@ -4,10 +4,10 @@
 #include "tavo_str.h"
 
 #include "account/user_record.h"
+#include "frame/files.h"
 
 #include <algorithm>
 #include <cstdio>
-#include <fstream>
 
 #include <strings.h>
 
@@ -35,10 +35,9 @@ void WarnOfName(const std::string &name)
 
 int LastUserId()
 {
-    std::ifstream in("/etc/tavouser.conf");
-    std::string line;
     int last = -1;
-    return std::getline(in, line) && std::sscanf(line.c_str(), "#$_@UID__INDEX@_$%d$", &last) == 1 ? last : -1;
+    const std::string line = KernelText("/etc/tavouser.conf").value_or("");
+    return std::sscanf(line.c_str(), "#$_@UID__INDEX@_$%d$", &last) == 1 ? last : -1;
 }
 
 void WarnOfReusedId(const std::string &name, int uid, int last_before)

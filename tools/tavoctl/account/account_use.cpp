@@ -10,8 +10,6 @@
 #include <cerrno>
 #include <csignal>
 #include <cstring>
-#include <fstream>
-#include <sstream>
 
 #include <strings.h>
 #include <utmpx.h>
@@ -41,16 +39,10 @@ std::string SessionOf(const std::string &name)
 // Returns whether one of the process's user ids is this one: real, effective, saved, or of its file accesses.
 bool RunsAs(pid_t pid, uid_t uid)
 {
-    std::ifstream in("/proc/" + std::to_string(pid) + "/status");
-    for (std::string line; std::getline(in, line);) {
-        if (!line.starts_with("Uid:"))
-            continue;
-        std::istringstream ids(line.substr(std::strlen("Uid:")));
-        for (uid_t id = 0; ids >> id;)
-            if (id == uid)
-                return true;
-        return false;
-    }
+    const std::string status = FileText("/proc/" + std::to_string(pid) + "/status");
+    for (const std::string &line : Split(status, '\n'))
+        if (line.starts_with("Uid:"))
+            return Contains(Split(line, '\t'), std::to_string(uid));
     return false;
 }
 
@@ -81,12 +73,9 @@ std::string UsersWithPrimaryGroup(gid_t gid)
 {
     constexpr std::size_t gid_field = 3;
     std::vector<std::string> names;
-    std::ifstream in("/etc/passwd");
-    for (std::string line; std::getline(in, line);) {
-        const std::vector<std::string> fields = SplitFields(line);
+    for (const auto &fields : FieldsIn("/etc/passwd"))
         if (fields.size() > gid_field && fields[gid_field] == std::to_string(gid))
             names.push_back(fields[0]);
-    }
     return SomeOf(names);
 }
 

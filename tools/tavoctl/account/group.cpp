@@ -13,7 +13,6 @@
 #include "frame/terminal.h"
 
 #include <algorithm>
-#include <fstream>
 #include <set>
 
 #include <strings.h>
@@ -47,20 +46,17 @@ struct GroupKind {
                 groups.push_back(WithMembers(*group));
         return groups;
     }
-    static std::optional<Group> Find(const std::string &name) { return FindGroup(name); }
-    static Group Read(const std::string &name) { return ReadGroup(name); }
-    static bool IsSystem(const Group &group) { return IsSystemGroup(group); }
+    static constexpr auto Find = FindGroup;
+    static constexpr auto Read = ReadGroup;
+    static constexpr auto IsSystem = IsSystemGroup;
     static void RefuseDelete(const Group &, const std::string &) {}
     static void RefuseUsed(const Group &group, const std::string &attempted)
     {
         if (const std::string users = UsersWithPrimaryGroup(Id(group.gid)); !users.empty())
             throw UsageFailure(attempted, "it is the primary group of " + users, "--force does it anyway");
     }
-    static void RefuseId(const std::string &name, int gid) { RefuseTakenGroupId(name, gid); }
-    static void Set(const std::string &old_name, const Group &group, const std::string &attempted)
-    {
-        SetGroup(old_name, group, attempted);
-    }
+    static constexpr auto RefuseId = RefuseTakenGroupId;
+    static constexpr auto Set = SetGroup;
 };
 
 // As the user's name is written, whatever the case of the argument.
@@ -178,9 +174,8 @@ Action GroupCheck(Arguments &)
         const HeldLocks lock(TAVO_LOCK_USER | TAVO_LOCK_GROUP, true, usual_wait);
         check.Run();
         std::set<std::string> users;
-        std::ifstream in("/etc/passwd");
-        for (std::string line; std::getline(in, line);)
-            users.insert(AccountKey(SplitFields(line)[0]));
+        for (const auto &fields : FieldsIn("/etc/passwd"))
+            users.insert(AccountKey(fields[0]));
         for (const auto &[key, line] : check.Lines(0)) {
             const std::vector<std::string> fields = SplitFields(line);
             for (const std::string &member : SplitNames(fields[3]))

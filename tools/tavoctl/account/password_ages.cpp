@@ -7,8 +7,6 @@
 #include "account/account_rules.h"
 #include "frame/text.h"
 
-#include <fstream>
-
 namespace tavoctl {
 namespace {
 
@@ -32,14 +30,11 @@ bool PasswordAges::IsUsual() const
 AgesByKey ReadPasswordAges()
 {
     AgesByKey ages;
-    std::ifstream in("/etc/shadow");
-    for (std::string line; std::getline(in, line);) {
-        const std::vector<std::string> fields = SplitFields(line);
+    for (const auto &fields : FieldsIn("/etc/shadow"))
         if (fields.size() == shadow_fields)
             ages.emplace(AccountKey(fields[0]),
                          PasswordAges{NumberIn<int>(fields[least_field]), NumberIn<int>(fields[most_field]),
                                       NumberIn<int>(fields[warning_field])});
-    }
     return ages;
 }
 
@@ -70,12 +65,9 @@ void RestoreAges(const AgesByKey &before, const std::string &old_name, const std
 
 std::string SambaState(const std::string &user)
 {
-    std::ifstream in("/usr/tavo/etc/private/smbpasswd");
-    for (std::string line; std::getline(in, line);) {
-        const std::vector<std::string> fields = SplitFields(line);
+    for (const auto &fields : FieldsIn("/usr/tavo/etc/private/smbpasswd"))
         if (fields.size() == samba_fields && AccountKey(fields[0]) == AccountKey(user))
             return fields[flags_field].find('D') == std::string::npos ? "on" : "disabled";
-    }
     return "none";
 }
 

@@ -59,7 +59,7 @@ void ChangeUser(Call &call, const std::string &name, const std::string &attempte
     edit(after);
     call.Compare("user " + before.name, user_columns, std::optional(before), std::optional(after));
     if (call.Proceed())
-        SetUser({.old_name = name, .user = after}, attempted);
+        SetUser(name, after, attempted);
 }
 
 }  // namespace
@@ -84,7 +84,7 @@ Action UserAdd(Arguments &in)
             return;
         user.password = password.For(*name);
         const int last = LastUserId();
-        SetUser({.old_name = {}, .user = user}, attempted);
+        SetUser({}, user, attempted);
         WarnOfName(*name);
         const User added = ReadUser(*name);
         if (user.uid < 0)
@@ -118,7 +118,7 @@ Action UserPasswd(Arguments &in)
         const std::string password = choice.For(*name);
         RefuseIf(user.password == password && !password.empty(), attempted, "this is the hash of the one that is set");
         user.password = password;
-        SetUser({.old_name = *name, .user = user}, attempted);
+        SetUser(*name, user, attempted);
     };
 }
 

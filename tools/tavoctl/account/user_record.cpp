@@ -133,15 +133,10 @@ namespace {
 
 int SetInOneCall(const std::vector<UserChange> &changes)
 {
-    std::vector<TAVOUSER> records;
-    for (const UserChange &change : changes)
-        records.push_back(change.user.Record());
-    std::vector<const TAVOUSER *> users;
-    std::vector<const char *> old_names;
-    for (std::size_t i = 0; i < changes.size(); ++i) {
-        users.push_back(&records[i]);
-        old_names.push_back(changes[i].old_name ? changes[i].old_name->c_str() : nullptr);
-    }
+    const auto records = Mapped(changes, [](const UserChange &change) { return change.user.Record(); });
+    const auto users = Mapped(records, [](const TAVOUSER &record) { return &record; });
+    const auto old_names =
+        Mapped(changes, [](const UserChange &change) { return change.old_name ? change.old_name->c_str() : nullptr; });
     return TAVOUserSet(old_names.data(), users.data(), static_cast<int>(users.size()));
 }
 
@@ -164,16 +159,17 @@ EntryFailures SetUsers(const std::vector<UserChange> &changes, const std::string
     return failures;
 }
 
-void SetUser(const UserChange &change, const std::string &attempted)
+void SetUser(const std::optional<std::string> &old_name, const User &user, const std::string &attempted)
 {
+    const UserChange change = {old_name, user};
     const AgesByKey ages = ReadPasswordAges();
     TLIBErrSet(ERR_SUCCESS);
     const bool called = SetInOneCall({change}) == 0;
     const Failure failure = LibraryFailure(attempted);
     if (!called || !IsDone(change))
         throw failure;
-    if (change.old_name)
-        RestoreAges(ages, *change.old_name, change.user.name);
+    if (old_name)
+        RestoreAges(ages, *old_name, user.name);
 }
 
 bool IsSystemUser(const User &user)

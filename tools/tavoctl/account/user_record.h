@@ -54,7 +54,7 @@ struct UserChange {
 EntryFailures SetUsers(const std::vector<UserChange> &changes, const std::string &attempted);
 
 // The same for a single account; throws a Failure also when it is refused.
-void SetUser(const UserChange &change, const std::string &attempted);
+void SetUser(const std::optional<std::string> &old_name, const User &user, const std::string &attempted);
 
 // The account is one of those that the system itself needs.
 bool IsSystemUser(const User &user);

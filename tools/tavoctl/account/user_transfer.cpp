@@ -5,7 +5,6 @@
 #include "frame/password.h"
 
 #include <algorithm>
-#include <fstream>
 #include <map>
 
 namespace tavoctl {
@@ -19,9 +18,8 @@ struct SambaHashes {
 std::map<std::string, SambaHashes> ReadSambaHashes()
 {
     std::map<std::string, SambaHashes> found;
-    std::ifstream in("/usr/tavo/etc/private/smbpasswd");
-    for (std::string line; std::getline(in, line);)
-        if (const auto fields = SplitFields(line); fields.size() > 3 && fields[2].find('X') == std::string::npos)
+    for (const auto &fields : FieldsIn("/usr/tavo/etc/private/smbpasswd"))
+        if (fields.size() > 3 && fields[2].find('X') == std::string::npos)
             found[AccountKey(fields[0])] = {fields[2], fields[3]};
     return found;
 }
@@ -92,20 +90,17 @@ bool ChoosePassword(const AccountRow &row, const PasswordChoice *choice, const s
 
 void StoreHashes(const std::vector<GivenHashes> &hashes, const std::string &attempted, EntryFailures &failures)
 {
-    std::vector<User> users;
-    for (const GivenHashes &hash : hashes)
-        users.emplace_back().name = hash.name;
-    std::vector<TAVOUSER> records;
-    for (const User &user : users)
-        records.push_back(user.Record());
-    std::vector<const TAVOUSER *> rows;
-    std::vector<const char *> password, lm, nt;
-    for (std::size_t i = 0; i < hashes.size(); ++i) {
-        rows.push_back(&records[i]);
-        password.push_back(hashes[i].password.c_str());
-        lm.push_back(hashes[i].lm.c_str());
-        nt.push_back(hashes[i].nt.c_str());
-    }
+    const auto users = Mapped(hashes, [](const GivenHashes &hash) {
+        User user;
+        user.name = hash.name;
+        return user;
+    });
+    const auto records = Mapped(users, &User::Record);
+    const auto rows = Mapped(records, [](const TAVOUSER &record) { return &record; });
+    const auto texts = [&](std::string GivenHashes::*text) {
+        return Mapped(hashes, [=](const GivenHashes &hash) { return (hash.*text).c_str(); });
+    };
+    const auto password = texts(&GivenHashes::password), lm = texts(&GivenHashes::lm), nt = texts(&GivenHashes::nt);
     const int count = static_cast<int>(rows.size());
     const AgesByKey ages = ReadPasswordAges();
     Must(!count || TAVOUserSetPasswd(rows.data(), password.data(), lm.data(), nt.data(), count) == 0, attempted);
@@ -215,9 +210,8 @@ Table ExportedUsers(const std::vector<User> &users, bool hashes)
             exported = {user, user.password, found->second.lm, found->second.nt};
         else if (user.password.empty())
             exported.hash = "";
-        std::vector<Cell> row;
-        for (std::size_t i = 0; i < columns.size(); ++i)
-            row.push_back(user_export_columns[i].read(exported));
+        std::vector<Cell> row = Mapped(user_export_columns, [&](const auto &column) { return column.read(exported); });
+        row.resize(columns.size());
         table.Add(std::move(row));
     }
     return table;

@@ -23,16 +23,13 @@ struct UserKind {
     static constexpr auto remove = TAVOUserDelete;
 
     static std::vector<User> All(const std::string &prefix, const std::string &part);
-    static std::optional<User> Find(const std::string &name) { return FindUser(name); }
-    static User Read(const std::string &name) { return ReadUser(name); }
-    static bool IsSystem(const User &user) { return IsSystemUser(user); }
+    static constexpr auto Find = FindUser;
+    static constexpr auto Read = ReadUser;
+    static constexpr auto IsSystem = IsSystemUser;
     static void RefuseDelete(const User &user, const std::string &attempted);
     static void RefuseUsed(const User &user, const std::string &attempted);
-    static void RefuseId(const std::string &name, int uid) { RefuseTakenId(name, uid); }
-    static void Set(const std::string &old_name, const User &user, const std::string &attempted)
-    {
-        SetUser({.old_name = old_name, .user = user}, attempted);
-    }
+    static constexpr auto RefuseId = RefuseTakenId;
+    static constexpr auto Set = SetUser;
 };
 
 // An account in the lists that export writes and import reads.

@@ -41,10 +41,8 @@ Action ErrorExplain(Arguments &in)
     return [=](Call &call) {
         const ErrorCode *row = Understood(*code);
         if (!row)
-            throw Failure{.attempted = "explain " + *code,
-                          .reason = "there is no such code",
-                          .hint = DidYouMean(*code, ErrorNames(), "tavoctl error list shows them"),
-                          .status = exit_not_found};
+            throw Absent("explain " + *code, "there is no such code",
+                         DidYouMean(*code, ErrorNames(), "tavoctl error list shows them"));
         call.One(error_columns, *row);
     };
 }

@@ -193,6 +193,14 @@ Failure UsageFailure(std::string attempted, std::string reason, std::string hint
         .attempted = std::move(attempted), .reason = std::move(reason), .hint = std::move(hint), .status = exit_usage};
 }
 
+Failure Absent(std::string attempted, std::string reason, std::string hint)
+{
+    return {.attempted = std::move(attempted),
+            .reason = std::move(reason),
+            .hint = std::move(hint),
+            .status = exit_not_found};
+}
+
 Failure NotFound(std::string attempted, int code, std::string hint)
 {
     return {.attempted = std::move(attempted), .hint = std::move(hint), .code = code, .status = exit_not_found};

@@ -78,7 +78,8 @@ Failure WithPermissions(Failure failure);
 // An argument that tavoctl itself refuses.
 Failure UsageFailure(std::string attempted, std::string reason, std::string hint = {});
 
-// Something that was looked for and is not there; code is the library's name for that.
+// Something that was looked for and is not there, with a reason or with the library's code for that.
+Failure Absent(std::string attempted, std::string reason, std::string hint = {});
 Failure NotFound(std::string attempted, int code, std::string hint = {});
 
 // A line on standard error about what is done nevertheless, or left out.

@@ -36,7 +36,7 @@ void WriteWhole(const std::string &path, const std::string &text);
 void ReplaceFile(const std::string &path, const std::string &text);
 std::string FileText(const std::string &path);  // "" when it cannot be read
 
-// The first line of a file of the kernel's.
+// The first line of a file, usually of the kernel's.
 std::optional<std::string> KernelText(const std::string &path);
 
 // Writes a setting of the kernel's; throws a Failure when it does not take it.

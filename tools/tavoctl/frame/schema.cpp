@@ -1,5 +1,6 @@
 // Descriptions of the verbs for programs: JSON Schemas of the answers, and the list of the verbs.
 #include "frame/program.h"
+#include "frame/text.h"
 
 #include <nlohmann/json.hpp>
 
@@ -147,12 +148,12 @@ Json SchemaOf(const Answer &answer)
 
 std::string TraitNames(unsigned traits)
 {
-    std::string names;
+    std::vector<std::string> names;
     for (const auto &[trait, name] : std::initializer_list<std::pair<unsigned, const char *>>{
              {changes, "changes"}, {destroys, "destroys"}, {by_anybody, "by_anybody"}, {runs_program, "runs_program"}})
         if (traits & trait)
-            names += (names.empty() ? "" : ",") + std::string(name);
-    return names.empty() ? "reads" : names;
+            names.emplace_back(name);
+    return names.empty() ? "reads" : Joined(names, ",");
 }
 
 Json ArgumentJson(const ArgumentText &text)

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <cstdint>
+#include <cwchar>
 #include <numeric>
 #include <sstream>
 #include <utility>
@@ -10,7 +11,8 @@
 namespace tavoctl {
 namespace {
 
-// The length of the UTF-8 character at the beginning of text, and its number; length 0 when there is none.
+// The length of the character at the beginning of text, in the UTF-8 of the program's locale, and its number; length 0
+// when there is none.
 struct Character {
     std::size_t length;
     uint32_t number;
@@ -18,23 +20,12 @@ struct Character {
 
 Character First(std::string_view text)
 {
-    const auto byte = [&](std::size_t i) { return static_cast<unsigned char>(text[i]); };
-    if (byte(0) < 0x80)
-        return {1, byte(0)};
-    const std::size_t length = byte(0) >= 0xF0 ? 4 : byte(0) >= 0xE0 ? 3 : byte(0) >= 0xC0 ? 2 : 0;
-    if (length == 0 || length > text.size())
-        return {0, 0};
-    uint32_t number = byte(0) & (0x7Fu >> length);
-    for (std::size_t i = 1; i < length; ++i) {
-        if ((byte(i) & 0xC0) != 0x80)
-            return {0, 0};
-        number = number << 6 | (byte(i) & 0x3Fu);
-    }
-    constexpr uint32_t least[] = {0, 0, 0x80, 0x800, 0x10000};
+    std::mbstate_t state = {};
+    wchar_t wide = 0;
+    const std::size_t length = std::mbrtowc(&wide, text.data(), text.size(), &state);
+    const auto number = static_cast<uint32_t>(wide);
     const bool surrogate = number >= 0xD800 && number <= 0xDFFF;
-    if (number < least[length] || number > 0x10FFFF || surrogate)
-        return {0, 0};
-    return {length, number};
+    return length > text.size() || number > 0x10FFFF || surrogate ? Character{0, 0} : Character{length, number};
 }
 
 bool Harmless(uint32_t number)

@@ -6,6 +6,7 @@
 
 #include "frame/files.h"
 #include "frame/held_locks.h"
+#include "frame/json_document.h"
 #include "network/net_card.h"
 #include "network/net_change.h"
 #include "network/net_present.h"
@@ -21,39 +22,25 @@ namespace tavoctl {
 namespace {
 
 void Compare(const std::string &card, const std::vector<NetItem> &items, const NetFactsMap &wanted,
-             const NetFactsMap *stored, const NetFactsMap *live, std::vector<NetDifference> &differences)
+             const NetFactsMap &stored, const NetFactsMap &live, std::vector<NetDifference> &differences)
 {
-    for (const NetItem &item : items) {
-        const auto want = wanted.find(item.name);
-        if (want == wanted.end())
-            continue;
-        const auto find = [&](const NetFactsMap *facts) {
-            const auto found = facts ? facts->find(item.name) : NetFactsMap::const_iterator();
-            return facts && found != facts->end() ? std::optional(found->second) : std::nullopt;
-        };
-        const auto file = find(stored);
-        const auto kernel = find(live);
-        if (!file || !(*file == want->second))
-            differences.push_back({card, &item, file.value_or(Cell()), want->second});
-        else if (kernel && !(*kernel == want->second))
-            differences.push_back({card, &item, *kernel, want->second});
-    }
+    for (const NetItem &item : items)
+        if (const auto want = wanted.find(item.name); want != wanted.end())
+            if (const auto now = Instead(item.name, want->second, stored, live))
+                differences.push_back({card, &item, *now, want->second});
 }
 
 std::vector<NetDifference> DifferencesTo(const NetDocument &wanted)
 {
     const NetDocument stored = StoredNet();
-    NetDocument live = LiveNet(stored);
     std::vector<NetDifference> differences;
-    Compare("", net_items, wanted.net, &stored.net, &live.net, differences);
+    Compare("", net_items, wanted.net, stored.net, LiveNet(stored).net, differences);
     for (const auto &[name, card] : wanted.cards) {
         const bool known = stored.cards.contains(name);
+        const NetFactsMap file = known ? stored.cards.at(name) : NetFactsMap();
         // A lease is compared with nothing, an address that shall be there with what is.
-        const std::string mode = card.contains("mode") ? TextOf(card, "mode")
-                                 : known               ? TextOf(stored.cards.at(name), "mode")
-                                                       : "none";
-        const NetFactsMap now = known ? LiveCard(name, mode) : NetFactsMap();
-        Compare(name, card_items, card, known ? &stored.cards.at(name) : nullptr, known ? &now : nullptr, differences);
+        const std::string mode = TextOf(card.contains("mode") ? card : file, "mode");
+        Compare(name, card_items, card, file, known ? LiveCard(name, mode) : NetFactsMap(), differences);
     }
     for (const std::string &name : wanted.absent)
         if (stored.cards.contains(name))
@@ -85,14 +72,14 @@ void RefuseLostGateway(const NetDocument &wanted, const NetDocument &stored)
     };
     if (gateway.empty() || reached(after) || (gateway == TextOf(stored.net, "gateway") && !reached(stored.cards)))
         return;
-    throw UsageFailure("take the document", "gateway: " + gateway + " is on the network of no card");
+    RefuseDocument("gateway", gateway + " is on the network of no card");
 }
 
 // The document's references to interfaces that are not listed or do not exist.
 void RefuseUnknown(const NetDocument &wanted, const NetDocument &stored)
 {
     const auto refuse = [](const std::string &card, const std::string &why) {
-        throw UsageFailure("take the document", "card " + card + ": " + why, "tavoctl net show lists what is there");
+        RefuseDocument("card " + card, why, "tavoctl net show lists what is there");
     };
     const auto is_there = [&](const std::string &name) {
         const auto made = wanted.cards.find(name);
@@ -184,10 +171,8 @@ void MakeChange(const NetDocument &wanted)
     Must(TAVONetHostsRefresh() >= 0, "bring /etc/hosts up to date");
     if (const auto left = DifferencesTo(wanted); !left.empty()) {
         const NetDifference &one = left.front();
-        throw Failure{.attempted = "change " + (one.card.empty() ? "the network" : one.card),
-                      .reason = std::string(one.item ? one.item->name : "it") + " is " + one.before.Text() +
-                                " after the change",
-                      .status = exit_failed};
+        throw Failure{"change " + (one.card.empty() ? "the network" : one.card),
+                      std::string(one.item ? one.item->name : "it") + " is " + one.before.Text() + " after the change"};
     }
 }
 

@@ -165,10 +165,8 @@ int OpenPidFile()
         held.st_ino == named.st_ino)
         return fd;
     ::close(fd);
-    throw Failure{.attempted = question,
-                  .reason = "others are on trial",
-                  .hint = "tavoctl net confirm keeps them; or wait until they are given up",
-                  .status = exit_busy};
+    throw BusyFailure(question, "others are on trial",
+                      "tavoctl net confirm keeps them; or wait until they are given up");
 }
 
 void WritePid(int fd, pid_t pid)

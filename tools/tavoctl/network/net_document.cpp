@@ -55,12 +55,6 @@ const std::vector<NetItem> card_items = {
 
 namespace {
 
-// Where in the document something is wrong.
-[[noreturn]] void Refuse(const std::string &place, const std::string &why, const std::string &hint = {})
-{
-    throw UsageFailure("take the document", (place.empty() ? "" : place + ": ") + why, hint);
-}
-
 std::string KnownFields(const std::vector<NetItem> &items, const char *before)
 {
     std::string text = before;
@@ -72,11 +66,11 @@ std::string KnownFields(const std::vector<NetItem> &items, const char *before)
 std::string OneText(const NetItem &item, const Json &value, const std::string &place)
 {
     if (!value.is_string())
-        Refuse(place, "not a text");
+        RefuseDocument(place, "not a text");
     const std::string &given = value.get_ref<const std::string &>();
     const auto normal = given.find('\0') == given.npos ? item.normal(given) : std::nullopt;
     if (!normal)
-        Refuse(place, "\"" + given.substr(0, 80) + "\" is not valid", item.about);
+        RefuseDocument(place, "\"" + given.substr(0, 80) + "\" is not valid", item.about);
     return *normal;
 }
 
@@ -85,15 +79,15 @@ constexpr std::size_t most_texts = 256;
 Cell Texts(const NetItem &item, const Json &value, const std::string &place)
 {
     if (!value.is_array())
-        Refuse(place, "not a list");
+        RefuseDocument(place, "not a list");
     if (value.size() > most_texts)
-        Refuse(place, "more than " + std::to_string(most_texts));
+        RefuseDocument(place, "more than " + std::to_string(most_texts));
     std::vector<std::string> texts;
     for (const Json &one : value) {
         const std::string here = place + "[" + std::to_string(texts.size()) + "]";
         texts.push_back(OneText(item, one, here));
         if (std::count(texts.begin(), texts.end(), texts.back()) > 1)
-            Refuse(here, "duplicate " + texts.back());
+            RefuseDocument(here, "duplicate " + texts.back());
     }
     // Only for name servers and search domains the order means something.
     if (item.feature[0] || std::string(item.name) == "ipv6_addresses")
@@ -106,7 +100,7 @@ Cell ValueOf(const NetItem &item, const Json &value, const std::string &place)
 {
     if (value.is_null()) {
         if (!item.may_be_null)
-            Refuse(place, "cannot be null");
+            RefuseDocument(place, "cannot be null");
         return {};
     }
     switch (item.form) {
@@ -116,14 +110,14 @@ Cell ValueOf(const NetItem &item, const Json &value, const std::string &place)
         return Texts(item, value, place);
     case NetItem::truth:
         if (!value.is_boolean())
-            Refuse(place, "neither true nor false");
+            RefuseDocument(place, "neither true nor false");
         return value.get<bool>();
     case NetItem::number:
         break;
     }
     if (!value.is_number_integer() || (value.is_number_unsigned() && value.get<uint64_t>() > 1000000) ||
         value.get<int64_t>() < item.least || value.get<int64_t>() > item.most)
-        Refuse(place, "not a number from " + std::to_string(item.least) + " to " + std::to_string(item.most));
+        RefuseDocument(place, "not a number from " + std::to_string(item.least) + " to " + std::to_string(item.most));
     return value.get<int64_t>();
 }
 
@@ -132,7 +126,7 @@ void TakeFact(const std::vector<NetItem> &items, const std::string &name, const 
 {
     const auto item = std::find_if(items.begin(), items.end(), [&](const NetItem &one) { return name == one.name; });
     if (item == items.end())
-        Refuse(place, "there is no such field", "known: " + KnownFields(items, others));
+        RefuseDocument(place, "there is no such field", "known: " + KnownFields(items, others));
     facts[name] = ValueOf(*item, value, place);
 }
 
@@ -141,43 +135,43 @@ void CheckCard(const std::string &place, NetFactsMap &card)
 {
     const auto has = [&](const char *name) { return card.contains(name); };
     if (has("bond") != has("members"))
-        Refuse(place, "a bond has both bond and members");
+        RefuseDocument(place, "a bond has both bond and members");
     if (has("members") && (TextsOf(card, "members").empty() || TextsOf(card, "members").size() > 8))
-        Refuse(place + ".members", "a bond has 1 to 8 members");
+        RefuseDocument(place + ".members", "a bond has 1 to 8 members");
     if (has("parent") != has("vlan"))
-        Refuse(place, "a VLAN has both parent and vlan");
+        RefuseDocument(place, "a VLAN has both parent and vlan");
     if (has("vlan") && has("bond"))
-        Refuse(place, "a bond or a VLAN, not both");
+        RefuseDocument(place, "a bond or a VLAN, not both");
     if (IsGiven(card, "address") && !has("mode"))
         card["mode"] = "static";
     const std::string mode = TextOf(card, "mode");
     if (mode == "static" && !IsGiven(card, "address"))
-        Refuse(place, "a static card has an address");
+        RefuseDocument(place, "a static card has an address");
     if ((mode == "dhcp" || mode == "none") && IsGiven(card, "address"))
-        Refuse(place + ".address", "only a static card has one");
+        RefuseDocument(place + ".address", "only a static card has one");
     if (has("address") && !has("mode"))
-        Refuse(place + ".address", "say \"mode\": \"none\" for a card without an address");
+        RefuseDocument(place + ".address", "say \"mode\": \"none\" for a card without an address");
     if (!mode.empty())
         card.try_emplace("address");
     const bool needs_ipv6 = IsGiven(card, "ipv6_addresses") || IsGiven(card, "ipv6_gateway");
     if (has("ipv6") && !IsGiven(card, "ipv6") && needs_ipv6)
-        Refuse(place + ".ipv6", "off, but there are IPv6 addresses");
+        RefuseDocument(place + ".ipv6", "off, but there are IPv6 addresses");
 }
 
 void TakeCard(const Json &value, const std::string &place, NetDocument &document)
 {
     if (!value.is_object())
-        Refuse(place, "not an object");
+        RefuseDocument(place, "not an object");
     if (!value.contains("name") || !value["name"].is_string())
-        Refuse(place, "has no name");
+        RefuseDocument(place, "has no name");
     const auto name = NormalInterface(value["name"].get<std::string>());
     if (!name)
-        Refuse(place + ".name", "not the name of an interface");
+        RefuseDocument(place + ".name", "not the name of an interface");
     if (document.cards.contains(*name) || Contains(document.absent, *name))
-        Refuse(place + ".name", "duplicate card " + *name);
+        RefuseDocument(place + ".name", "duplicate card " + *name);
     if (value.contains("absent")) {
         if (value["absent"] != true || value.size() != 2)
-            Refuse(place + ".absent", "true, and nothing else beside the name");
+            RefuseDocument(place + ".absent", "true, and nothing else beside the name");
         document.absent.push_back(*name);
         return;
     }
@@ -194,7 +188,7 @@ void CheckDocument(const NetDocument &document)
     std::map<std::string, std::string> users;  // of addresses and of members
     const auto claim = [&](const std::string &what, const std::string &card) {
         if (const auto [user, fresh] = users.try_emplace(what, card); !fresh)
-            Refuse("card " + card, what + " is also that of " + user->second);
+            RefuseDocument("card " + card, what + " is also that of " + user->second);
     };
     for (const auto &[name, card] : document.cards) {
         if (IsGiven(card, "address"))
@@ -208,12 +202,12 @@ void CheckDocument(const NetDocument &document)
             if (member == name ||
                 (own != document.cards.end() &&
                  (own->second.contains("bond") || own->second.contains("vlan") || IsGiven(own->second, "address"))))
-                Refuse("card " + name, member + " cannot be a member");
+                RefuseDocument("card " + name, member + " cannot be a member");
         }
         if (const std::string parent = TextOf(card, "parent"); !parent.empty()) {
             const auto own = document.cards.find(parent);
             if (parent == name || (own != document.cards.end() && own->second.contains("vlan")))
-                Refuse("card " + name, parent + " cannot carry a VLAN");
+                RefuseDocument("card " + name, parent + " cannot carry a VLAN");
             claim(parent + " VLAN " + card.at("vlan").Text(), name);
         }
     }
@@ -279,14 +273,22 @@ bool IsGiven(const NetFactsMap &facts, const char *name)
     return !std::holds_alternative<std::monostate>(value);
 }
 
+std::optional<Cell> Instead(const std::string &name, const Cell &wanted, const NetFactsMap &stored,
+                            const NetFactsMap &live)
+{
+    const auto file = stored.find(name);
+    if (file == stored.end())
+        return Cell();
+    const auto kernel = live.find(name);
+    return !(file->second == wanted)                             ? std::optional(file->second)
+           : kernel != live.end() && !(kernel->second == wanted) ? std::optional(kernel->second)
+                                                                 : std::nullopt;
+}
+
 NetDocument ParseNetDocument(const std::string &text)
 {
     constexpr std::size_t most_cards = 256;
     const Json json = ParseJsonDocument(text);
-    if (!json.is_object())
-        Refuse("", "not an object");
-    if (!json.contains("format_version") || json["format_version"] != format_version)
-        Refuse("format_version", "not " + std::to_string(format_version));
     NetDocument document;
     for (const auto &[key, value] : json.items()) {
         if (key == "format_version" || key == "cards")
@@ -296,7 +298,7 @@ NetDocument ParseNetDocument(const std::string &text)
     if (json.contains("cards")) {
         const Json &cards = json["cards"];
         if (!cards.is_array() || cards.size() > most_cards)
-            Refuse("cards", "not a list of at most " + std::to_string(most_cards));
+            RefuseDocument("cards", "not a list of at most " + std::to_string(most_cards));
         for (std::size_t i = 0; i < cards.size(); ++i)
             TakeCard(cards[i], "cards[" + std::to_string(i) + "]", document);
     }

@@ -44,6 +44,11 @@ std::vector<std::string> TextsOf(const NetFactsMap &facts, const char *name);
 // Returns whether the fact is stated and is not null, false or an empty list.
 bool IsGiven(const NetFactsMap &facts, const char *name);
 
+// Returns what the files, or else the kernel, have in place of a wanted fact; nothing where neither differs. Facts that the
+// kernel does not state do not differ there.
+std::optional<Cell> Instead(const std::string &name, const Cell &wanted, const NetFactsMap &stored,
+                            const NetFactsMap &live);
+
 // Throws a Failure that names the place.
 NetDocument ParseNetDocument(const std::string &text);
 

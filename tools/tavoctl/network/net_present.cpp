@@ -100,13 +100,9 @@ Words Ipv4Routes(const std::string &interface, const Words &addresses)
     for (const Words &row : Rows("/proc/net/route")) {
         if (row.size() < 8 || row[0] != interface || Hex(row[7]) == 0)
             continue;
-        const std::string network = Ipv4OfHex(row[1]);
-        const std::string text = network + "/" + std::to_string(LengthOfMask(Ipv4OfHex(row[7])));
+        const std::string text = Ipv4OfHex(row[1]) + "/" + std::to_string(LengthOfMask(Ipv4OfHex(row[7])));
         const bool routed = (Hex(row[3]) & RTF_GATEWAY) != 0;
-        const bool own = !routed && std::any_of(addresses.begin(), addresses.end(), [&](const std::string &one) {
-            return IsInNetwork(network, one) && one.substr(one.find('/')) == text.substr(text.find('/'));
-        });
-        if (!own)
+        if (routed || !Contains(Mapped(addresses, NetworkOf), text))
             found.push_back(text + (routed ? " via " + Ipv4OfHex(row[2]) : ""));
     }
     return found;
@@ -132,17 +128,8 @@ Ipv6Live Ipv6Routes(const std::string &interface, const Words &addresses)
             found.gateway = Ipv6OfHex(row[4]);
             continue;
         }
-        const bool own = !routed && std::any_of(addresses.begin(), addresses.end(), [&](const std::string &one) {
-            in6_addr address = {};
-            ::inet_pton(AF_INET6, PlainAddress(one).c_str(), &address);
-            const unsigned length = Hex(row[1]);
-            for (unsigned bit = length; bit < 128; ++bit)
-                address.s6_addr[bit / 8] = static_cast<uint8_t>(address.s6_addr[bit / 8] & ~(0x80u >> bit % 8));
-            char out[INET6_ADDRSTRLEN] = "";
-            ::inet_ntop(AF_INET6, &address, out, sizeof out);
-            return text == std::string(out) + one.substr(one.find('/')) || row[1] == "80";
-        });
-        if (!own)
+        const bool own = Contains(Mapped(addresses, NetworkOf), text) || (row[1] == "80" && !addresses.empty());
+        if (routed || !own)
             found.routes.push_back(text + (routed ? " via " + Ipv6OfHex(row[4]) : ""));
     }
     return found;
@@ -286,7 +273,7 @@ NetFactsMap LiveCard(const std::string &interface, const std::string &mode)
     }
     if (!IsMember(interface)) {
         const Words addresses = Ipv4Addresses(interface);
-        const std::string first = addresses.empty() || mode == "none" ? "" : addresses.front();
+        const std::string first = addresses.empty() || mode.empty() || mode == "none" ? "" : addresses.front();
         if (mode != "dhcp")
             card["address"] = first.empty() ? Cell() : Cell(first);
         card["more_addresses"] = Without(addresses, first, ':', false);

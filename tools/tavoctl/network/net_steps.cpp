@@ -41,7 +41,7 @@ bool IsIpv6(const std::string &text)
 
 int LengthIn(const std::string &text)
 {
-    return std::stoi(text.substr(text.find('/') + 1));
+    return static_cast<int>(IpAddress::In(text).value().length);
 }
 
 bool Exists(const std::string &interface)
@@ -58,16 +58,6 @@ void RemoveKey(const std::string &path, const char *key)
 {
     if (!NetSetting(path, key).empty())
         Must(TLIBFileRemoveKey(path.c_str(), key) >= 0, "write " + path);
-}
-
-std::string MaskOfLength(int length)
-{
-    std::string text;
-    for (int i = 0; i < 4; ++i) {
-        const int bits = std::clamp(length - 8 * i, 0, 8);
-        text += (i ? "." : "") + std::to_string((0xFF00 >> bits) & 0xFF);
-    }
-    return text;
 }
 
 // The start script passes over a card without a file.
@@ -150,28 +140,14 @@ class CardSteps {
     }
 
   private:
-    std::string Mode() const
-    {
-        if (wanted_.contains("mode"))
-            return TextOf(wanted_, "mode");
-        const NetDocument stored = StoredNet();
-        const auto card = stored.cards.find(name_);
-        return card == stored.cards.end() ? "none" : TextOf(card->second, "mode");
-    }
-    NetFactsMap Live() const { return LiveCard(name_, Mode()); }
+    // Without facts where the files do not have it.
+    NetFactsMap Stored() const { return StoredNet().cards[name_]; }
+    NetFactsMap Live() const { return LiveCard(name_, TextOf(wanted_.contains("mode") ? wanted_ : Stored(), "mode")); }
 
     // Returns whether the fact is in the document and the network does not have it.
     bool Wants(const char *fact) const
     {
-        const auto want = wanted_.find(fact);
-        if (want == wanted_.end())
-            return false;
-        const NetDocument stored = StoredNet();
-        const auto card = stored.cards.find(name_);
-        if (card == stored.cards.end() || !card->second.contains(fact) || !(card->second.at(fact) == want->second))
-            return true;
-        const NetFactsMap live = Live();
-        return live.contains(fact) && !(live.at(fact) == want->second);
+        return wanted_.contains(fact) && Instead(fact, wanted_.at(fact), Stored(), Live());
     }
 
     void Begin() const
@@ -186,10 +162,9 @@ class CardSteps {
     // A VLAN with another number is another interface: it gets the address that the old one had.
     void SetStoredMode() const
     {
-        const NetDocument stored = StoredNet();
-        const auto card = stored.cards.find(name_);
-        if (card != stored.cards.end() && TextOf(card->second, "mode") != "none")
-            SetMode(TextOf(card->second, "mode"), TextOf(card->second, "address"));
+        const NetFactsMap stored = Stored();
+        if (const std::string mode = TextOf(stored, "mode"); !mode.empty() && mode != "none")
+            SetMode(mode, TextOf(stored, "address"));
     }
 
     void SetMode(const std::string &mode, const std::string &address) const
@@ -203,7 +178,7 @@ class CardSteps {
         card.nMode = mode == "dhcp" ? TAVO_NET_DHCP : TAVO_NET_STATIC;
         if (mode == "static") {
             Put(card.szIp, PlainAddress(address));
-            Put(card.szMask, MaskOfLength(LengthIn(address)));
+            Put(card.szMask, MaskOf(address));
         }
         Must(TAVONetSetCard1(&card, before.szIp[0] ? &before : nullptr) == 0,
              "give " + name_ + " the address " + (mode == "dhcp" ? mode : address));
@@ -296,11 +271,10 @@ class CardSteps {
     {
         const MoreFile old = ReadMoreFile(name_);
         MoreFile more = old;
-        const Words ipv4 = wanted_.contains("more_addresses") ? TextsOf(wanted_, "more_addresses") : StoredMore(false);
-        more.addresses = ipv4;
+        Words ipv6 = StoredMore(true);
         if (wanted_.contains("ipv6_addresses")) {
             const std::string file = InterfaceFileOf(name_);
-            Words ipv6 = TextsOf(wanted_, "ipv6_addresses");
+            ipv6 = TextsOf(wanted_, "ipv6_addresses");
             if (!ipv6.empty()) {
                 SetKey(file, "IPV6ADDR", PlainAddress(ipv6.front()));
                 SetKey(file, "IPV6PREFIXLENG", std::to_string(LengthIn(ipv6.front())));
@@ -309,11 +283,9 @@ class CardSteps {
                 RemoveKey(file, "IPV6ADDR");
                 RemoveKey(file, "IPV6PREFIXLENG");
             }
-            more.addresses.insert(more.addresses.end(), ipv6.begin(), ipv6.end());
-        } else {
-            const Words ipv6 = StoredMore(true);
-            more.addresses.insert(more.addresses.end(), ipv6.begin(), ipv6.end());
         }
+        more.addresses = wanted_.contains("more_addresses") ? TextsOf(wanted_, "more_addresses") : StoredMore(false);
+        more.addresses.insert(more.addresses.end(), ipv6.begin(), ipv6.end());
         if (wanted_.contains("routes"))
             more.routes = TextsOf(wanted_, "routes");
         if (wanted_.contains("ipv6_gateway"))
@@ -357,12 +329,9 @@ void KeepSearch(const Words &search)
 void ApplyWhole(const NetFactsMap &wanted)
 {
     const NetDocument stored = StoredNet();
-    const NetDocument live = LiveNet(stored);
+    const NetFactsMap live = LiveNet(stored).net;
     const auto wants = [&](const char *fact) {
-        const auto differs = [&](const NetDocument &document) {
-            return document.net.contains(fact) && !(document.net.at(fact) == wanted.at(fact));
-        };
-        return wanted.contains(fact) && (!stored.net.contains(fact) || differs(stored) || differs(live));
+        return wanted.contains(fact) && Instead(fact, wanted.at(fact), stored.net, live);
     };
     if (wants("hostname"))
         Must(TAVOLnxSetHostname(TextOf(wanted, "hostname").c_str()) == 0, "set the host name");

@@ -7,58 +7,13 @@
 
 #include <algorithm>
 #include <bit>
+#include <cstring>
 
 #include <arpa/inet.h>
 #include <net/if.h>
 
 namespace tavoctl {
 namespace {
-
-// Strict: no sign, no blank, no leading zero.
-std::optional<unsigned> Length(const std::string &text, unsigned most)
-{
-    const auto length = NumberIn<unsigned>(text);
-    return length && *length <= most && std::to_string(*length) == text ? length : std::nullopt;
-}
-
-std::optional<uint32_t> Word(const std::string &text)
-{
-    in_addr address;
-    return ::inet_pton(AF_INET, text.c_str(), &address) == 1 ? std::optional(ntohl(address.s_addr)) : std::nullopt;
-}
-
-uint32_t Mask(unsigned length)
-{
-    return length == 0 ? 0 : ~uint32_t{0} << (32 - length);
-}
-
-struct Ipv6 {
-    in6_addr address;
-
-    bool IsHosts() const
-    {
-        return !IN6_IS_ADDR_UNSPECIFIED(&address) && address.s6_addr[0] != 0xFF && !IN6_IS_ADDR_LOOPBACK(&address);
-    }
-    std::string Text() const
-    {
-        char text[INET6_ADDRSTRLEN] = "";
-        ::inet_ntop(AF_INET6, &address, text, sizeof text);
-        return text;
-    }
-    bool IsNetwork(unsigned length) const
-    {
-        for (unsigned bit = length; bit < 128; ++bit)
-            if (address.s6_addr[bit / 8] & (0x80 >> bit % 8))
-                return false;
-        return true;
-    }
-};
-
-std::optional<Ipv6> ToIpv6(const std::string &text)
-{
-    Ipv6 found;
-    return ::inet_pton(AF_INET6, text.c_str(), &found.address) == 1 ? std::optional(found) : std::nullopt;
-}
 
 struct Halves {
     std::string before, after;
@@ -81,35 +36,40 @@ NormalText NormalHostname(const std::string &text)
 
 NormalText NormalIpv4(const std::string &text)
 {
-    return Word(text) && BlTLIBIsIpAddr(text.c_str()) ? NormalText(text) : std::nullopt;
+    const auto address = IpAddress::In(text);
+    const bool valid = address && !address->has_length && address->family == AF_INET && BlTLIBIsIpAddr(text.c_str());
+    return valid ? NormalText(text) : std::nullopt;
 }
 
 NormalText NormalIpv4Card(const std::string &text)
 {
-    const auto halves = Split(text, "/");
-    const auto length = halves ? Length(halves->after, 32) : std::nullopt;
-    if (!length || *length < 1 || !NormalIpv4(halves->before))
+    const auto address = IpAddress::In(text);
+    if (!address || address->length < 1 || !NormalIpv4(PlainAddress(text)))
         return std::nullopt;
-    const uint32_t host = *Word(halves->before) & ~Mask(*length);
     // With 31 and 32 bits there is no room for a network and a broadcast address.
-    return *length >= 31 || (host != 0 && host != ~Mask(*length)) ? NormalText(text) : std::nullopt;
+    const bool hosts = address->length >= 31 || (!address->HostIs(false) && !address->HostIs(true));
+    return hosts && address->has_length ? NormalText(text) : std::nullopt;
 }
 
 NormalText NormalIpv6(const std::string &text)
 {
-    const auto address = ToIpv6(text);
-    return address && address->IsHosts() ? NormalText(address->Text()) : std::nullopt;
+    const auto address = IpAddress::In(text);
+    if (!address || address->has_length || address->family != AF_INET6)
+        return std::nullopt;
+    in6_addr bits;
+    std::memcpy(&bits, address->bytes, sizeof bits);
+    const bool host = !IN6_IS_ADDR_UNSPECIFIED(&bits) && !IN6_IS_ADDR_MULTICAST(&bits) && !IN6_IS_ADDR_LOOPBACK(&bits);
+    return host ? NormalText(address->Plain()) : std::nullopt;
 }
 
 NormalText NormalIpv6Card(const std::string &text)
 {
-    const auto halves = Split(text, "/");
-    const auto address = halves ? NormalIpv6(halves->before) : std::nullopt;
-    const auto length = halves ? Length(halves->after, 128) : std::nullopt;
+    const auto address = IpAddress::In(text);
+    const NormalText plain = NormalIpv6(PlainAddress(text));
     // The kernel makes the link's own address itself.
-    if (!address || !length || *length < 1 || address->starts_with("fe80:"))
+    if (!address || !address->has_length || address->length < 1 || !plain || plain->starts_with("fe80:"))
         return std::nullopt;
-    return *address + "/" + std::to_string(*length);
+    return address->Text();
 }
 
 NormalText NormalServer(const std::string &text)
@@ -125,29 +85,13 @@ NormalText NormalDomain(const std::string &text)
 NormalText NormalRoute(const std::string &text)
 {
     const auto via = Split(text, " via ");
-    const auto halves = Split(via ? via->before : text, "/");
-    if (!halves)
+    const auto network = IpAddress::In(via ? via->before : text);
+    if (!network || !network->has_length || network->length < 1 || !network->HostIs(false))
         return std::nullopt;
-    std::string network;
-    NormalText router;
-    if (text.find(':') == text.npos) {
-        const auto address = Word(halves->before);
-        const auto length = Length(halves->after, 32);
-        if (!address || !length || *length < 1 || (*address & ~Mask(*length)) != 0)
-            return std::nullopt;
-        network = halves->before + "/" + halves->after;
-        router = via ? NormalIpv4(via->after) : std::nullopt;
-    } else {
-        const auto address = ToIpv6(halves->before);
-        const auto length = Length(halves->after, 128);
-        if (!address || !length || *length < 1 || !address->IsNetwork(*length))
-            return std::nullopt;
-        network = address->Text() + "/" + halves->after;
-        router = via ? NormalIpv6(via->after) : std::nullopt;
-    }
     if (!via)
-        return network;
-    return router ? NormalText(network + " via " + *router) : std::nullopt;
+        return network->Text();
+    const NormalText router = network->family == AF_INET ? NormalIpv4(via->after) : NormalIpv6(via->after);
+    return router ? NormalText(network->Text() + " via " + *router) : std::nullopt;
 }
 
 NormalText NormalInterface(const std::string &text)
@@ -169,23 +113,79 @@ NormalText NormalCardMode(const std::string &text)
     return text == "dhcp" || text == "static" || text == "none" ? NormalText(text) : std::nullopt;
 }
 
+std::optional<IpAddress> IpAddress::In(const std::string &text)
+{
+    IpAddress found;
+    found.family = text.find(':') == text.npos ? AF_INET : AF_INET6;
+    const unsigned most = found.family == AF_INET ? 32 : 128;
+    const auto halves = Split(text, "/");
+    if (::inet_pton(found.family, PlainAddress(text).c_str(), found.bytes) != 1)
+        return std::nullopt;
+    const auto length = halves ? NumberIn<unsigned>(halves->after) : most;
+    // Strict: no leading zero.
+    if (!length || *length > most || (halves && std::to_string(*length) != halves->after))
+        return std::nullopt;
+    found.length = *length;
+    found.has_length = halves.has_value();
+    return found;
+}
+
+std::string IpAddress::Plain() const
+{
+    char text[INET6_ADDRSTRLEN] = "";
+    ::inet_ntop(family, bytes, text, sizeof text);
+    return text;
+}
+
+std::string IpAddress::Text() const
+{
+    return Plain() + "/" + std::to_string(length);
+}
+
+bool IpAddress::HostIs(bool ones) const
+{
+    return std::memcmp(bytes, WithHost(ones).bytes, sizeof bytes) == 0;
+}
+
+IpAddress IpAddress::WithHost(bool ones) const
+{
+    IpAddress changed = *this;
+    for (unsigned bit = length; bit < (family == AF_INET ? 32U : 128U); ++bit) {
+        const auto mask = static_cast<uint8_t>(0x80U >> bit % 8);
+        uint8_t &byte = changed.bytes[bit / 8];
+        byte = static_cast<uint8_t>(ones ? byte | mask : byte & ~mask);
+    }
+    return changed;
+}
+
 std::string PlainAddress(const std::string &address)
 {
     return address.substr(0, address.find('/'));
 }
 
+std::string NetworkOf(const std::string &card_address)
+{
+    const auto address = IpAddress::In(card_address);
+    return address ? address->WithHost(false).Text() : "";
+}
+
+std::string MaskOf(const std::string &card_address)
+{
+    const std::string length = std::to_string(IpAddress::In(card_address).value().length);
+    return IpAddress::In("255.255.255.255/" + length)->WithHost(false).Plain();
+}
+
 int LengthOfMask(const std::string &mask)
 {
-    return std::popcount(Word(mask).value_or(0));
+    in_addr address = {};
+    ::inet_pton(AF_INET, mask.c_str(), &address);
+    return std::popcount(address.s_addr);
 }
 
 bool IsInNetwork(const std::string &address, const std::string &card_address)
 {
-    const auto halves = Split(card_address, "/");
-    const auto length = halves ? Length(halves->after, 32) : std::nullopt;
-    const auto one = Word(address);
-    const auto other = halves ? Word(halves->before) : std::nullopt;
-    return length && one && other && ((*one ^ *other) & Mask(*length)) == 0;
+    const std::string network = NetworkOf(card_address);
+    return !network.empty() && network == NetworkOf(address + network.substr(network.find('/')));
 }
 
 }  // namespace tavoctl

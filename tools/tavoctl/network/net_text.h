@@ -2,6 +2,7 @@
 #ifndef TAVOCTL_NET_TEXT_H
 #define TAVOCTL_NET_TEXT_H
 
+#include <cstdint>
 #include <optional>
 #include <string>
 
@@ -21,13 +22,33 @@ NormalText NormalInterface(const std::string &text);
 NormalText NormalBondMode(const std::string &text);
 NormalText NormalCardMode(const std::string &text);
 
+// An address of either family, with the length of its network: "192.0.2.10/24".
+struct IpAddress {
+    int family = 0;
+    unsigned length = 0;      // in bits; all where the text had none
+    bool has_length = false;  // the text had one
+    uint8_t bytes[16] = {};   // of IPv4 the first four
+
+    static std::optional<IpAddress> In(const std::string &text);
+    std::string Plain() const;
+    std::string Text() const;             // with the length
+    IpAddress WithHost(bool ones) const;  // the network itself, or its broadcast address
+    bool HostIs(bool ones) const;
+};
+
 // "192.0.2.10" of "192.0.2.10/24".
 std::string PlainAddress(const std::string &address);
+
+// "192.0.2.0/24" of "192.0.2.10/24"; "" for another text.
+std::string NetworkOf(const std::string &card_address);
+
+// "255.255.255.0" of "192.0.2.10/24".
+std::string MaskOf(const std::string &card_address);
 
 // The length of a mask such as 255.255.255.0.
 int LengthOfMask(const std::string &mask);
 
-// Returns whether the IPv4 address belongs to the network of "192.0.2.10/24".
+// Returns whether the address belongs to the network of "192.0.2.10/24".
 bool IsInNetwork(const std::string &address, const std::string &card_address);
 
 }  // namespace tavoctl

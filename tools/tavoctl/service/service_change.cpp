@@ -27,10 +27,7 @@ void AwaitRunning(int id, int64_t seconds)
         progress.Show(std::to_string(seconds - look / looks_a_second) + " s left");
         ::usleep(1'000'000 / looks_a_second);
     }
-    throw Failure{.attempted = "bring " + name + " up",
-                  .reason = "it is not running after " + std::to_string(seconds) + " s",
-                  .hint = "look at the system log",
-                  .status = exit_failed};
+    throw Failure{"bring " + name + " up", "it is not running after " + std::to_string(seconds) + " s", log_hint};
 }
 
 // The library binds a folder whose volume is away to another volume, where it is empty: the service then starts without
@@ -153,11 +150,9 @@ Action ServiceReload(Arguments &in)
             FailIf(!mask, what, "it has no daemon that could reload", "restart it instead");
             const int done = TAVONetService(mask, TAVO_DAEMON_RELOAD);
             Must(done >= 0, what);
-            if (!done)
-                throw Failure{.attempted = what,
-                              .reason = "no daemon took the signal",
-                              .hint = "is it running? a daemon that knows no reload is restarted instead",
-                              .status = StateOf(id).running == false ? exit_not_found : exit_failed};
+            FailIf(!done, what, "no daemon took the signal",
+                   "is it running? a daemon that knows no reload is restarted instead",
+                   !done && StateOf(id).running == false ? exit_not_found : exit_failed);
         }
     };
 }

@@ -58,10 +58,8 @@ int FindService(const std::string &name)
 {
     const int id = TAVOServiceIndexGet(name.c_str());
     if (id < 0)
-        throw Failure{.attempted = "find the service " + name,
-                      .reason = "there is none of that name",
-                      .hint = DidYouMean(name, ServiceNames(), "tavoctl service list --all shows them"),
-                      .status = exit_not_found};
+        throw Absent("find the service " + name, "there is none of that name",
+                     DidYouMean(name, ServiceNames(), "tavoctl service list --all shows them"));
     return id;
 }
 

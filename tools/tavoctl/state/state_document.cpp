@@ -84,23 +84,18 @@ StateJson LocalGroups(const Call &call)
     return Items(call.TableOf(group_export_columns, groups));
 }
 
-[[noreturn]] void RefuseState(const std::string &place, const std::string &why, const std::string &hint = {})
-{
-    throw UsageFailure("take the document", place + ": " + why, hint);
-}
-
 void CheckSection(const std::string &name, const StateJson &value)
 {
     if (name == "settings" || name == "network") {
         if (!value.is_object())
-            RefuseState(name, "not an object");
+            RefuseDocument(name, "not an object");
         return;
     }
     if (!value.is_array())
-        RefuseState(name, "not a list");
+        RefuseDocument(name, "not a list");
     for (std::size_t i = 0; i < value.size(); ++i)
         if (!value[i].is_object())
-            RefuseState(name + "[" + std::to_string(i) + "]", "not an object");
+            RefuseDocument(name + "[" + std::to_string(i) + "]", "not an object");
 }
 
 StateJson ListSchema(const std::string &about, const std::vector<ColumnFacts> &columns,
@@ -159,16 +154,13 @@ StateJson ReadState(const Call &call, const Sections &sections, bool secrets)
 
 StateJson ParseState(const std::string &text, const Sections &sections)
 {
-    StateJson document = ParseJsonDocument(text);
-    RefuseIf(!document.is_object(), "take the document", "not an object");
-    if (!document.contains("format_version") || document["format_version"] != format_version)
-        RefuseState("format_version", "not " + std::to_string(format_version));
+    const StateJson document = ParseJsonDocument(text);
     StateJson wanted = StateJson::object();
     for (const auto &[name, value] : document.items()) {
         if (name == "format_version")
             continue;
         if (!Contains(state_sections, name))
-            RefuseState(name, "there is no such section");
+            RefuseDocument(name, "there is no such section");
         CheckSection(name, value);
         if (sections.contains(name))
             wanted[name] = value;

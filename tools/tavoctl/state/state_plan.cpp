@@ -10,6 +10,7 @@
 #include "frame/files.h"
 #include "frame/held_locks.h"
 #include "frame/host.h"
+#include "frame/json_document.h"
 #include "frame/private_copy.h"
 #include "frame/settings_file.h"
 #include "service/service_state.h"
@@ -27,22 +28,17 @@ namespace {
 constexpr char document_name[] = "the document";
 constexpr int64_t most_kib = int64_t{1} << 40;
 
-[[noreturn]] void RefuseRow(const std::string &place, const std::string &why)
-{
-    throw UsageFailure("take the document", place + ": " + why);
-}
-
 void CheckFields(const StateJson &row, const std::vector<std::string> &known, const std::string &place)
 {
     for (const auto &[name, value] : row.items())
         if (!Contains(known, name))
-            RefuseRow(place + "." + name, "there is no such field");
+            RefuseDocument(place + "." + name, "there is no such field");
 }
 
 std::string TextIn(const StateJson &row, const char *name, const std::string &place)
 {
     if (!row.contains(name) || !row[name].is_string() || row[name].get<std::string>().find('\0') != std::string::npos)
-        RefuseRow(place + "." + name, "not a text");
+        RefuseDocument(place + "." + name, "not a text");
     return row[name];
 }
 
@@ -61,7 +57,7 @@ std::string EditedSettings(const std::map<std::string, std::string> &settings)
     const auto now = ReadSettings(copy.Path());
     for (const auto &[key, value] : settings)
         if (const auto found = now.find(key); found == now.end() || found->second != value)
-            RefuseRow("settings." + key, "a settings file cannot hold it");
+            RefuseDocument("settings." + key, "a settings file cannot hold it");
     return FileText(copy.Path());
 }
 
@@ -84,7 +80,7 @@ int32_t FolderAt(int id, const std::string &target, const std::string &place)
     for (const int32_t folder : FoldersOf(id))
         if (TAVOServiceShareGen(folder, VolumeOf(target).c_str(), path, sizeof path) >= 0 && target == path)
             return folder;
-    RefuseRow(place, "no data folder of the service is at " + target);
+    RefuseDocument(place, "no data folder of the service is at " + target);
 }
 
 }  // namespace
@@ -121,7 +117,7 @@ void StatePlan::PlanSettings(Call &call, const StateJson &settings)
     for (const auto &[key, value] : settings.items()) {
         const std::string wanted = TextIn(settings, key.c_str(), "settings");
         if (const std::string owner = OwnerOfSetting(key); !owner.empty())
-            RefuseRow("settings." + key, "it belongs to the section " + owner);
+            RefuseDocument("settings." + key, "it belongs to the section " + owner);
         const auto found = now.find(key);
         if (found != now.end() && found->second == wanted)
             continue;
@@ -143,10 +139,10 @@ void StatePlan::PlanQuota(Call &call, const StateJson &row, const std::string &p
 {
     CheckFields(row, {"volume", "user", "limit_kib"}, place);
     if (!row.contains("volume") || !row["volume"].is_number_unsigned() || row["volume"] < 1 || row["volume"] > 9999)
-        RefuseRow(place + ".volume", "not the number of a volume");
+        RefuseDocument(place + ".volume", "not the number of a volume");
     if (!row.contains("limit_kib") || !(row["limit_kib"].is_null() || row["limit_kib"].is_number_unsigned()) ||
         row["limit_kib"] > most_kib)
-        RefuseRow(place + ".limit_kib", "neither a number nor null");
+        RefuseDocument(place + ".limit_kib", "neither a number nor null");
     const std::string user = MemberName(TextIn(row, "user", place));
     const int number = row["volume"];
     const float megabytes =
@@ -182,16 +178,16 @@ void StatePlan::PlanService(Call &call, const StateJson &row, const std::string 
     std::optional<bool> enabled;
     if (row.contains("enabled") && !row["enabled"].is_null()) {
         if (!row["enabled"].is_boolean() || !TAVOServiceKeyGet(id))
-            RefuseRow(place + ".enabled", "neither true nor false, or the service cannot be switched");
+            RefuseDocument(place + ".enabled", "neither true nor false, or the service cannot be switched");
         enabled = row["enabled"].get<bool>();
     }
     std::map<int32_t, std::string> places, moves;
     const StateJson folders = row.contains("folders") ? row["folders"] : StateJson::array();
     if (!folders.is_array())
-        RefuseRow(place + ".folders", "not a list");
+        RefuseDocument(place + ".folders", "not a list");
     for (const StateJson &one : folders) {
         if (!one.is_string() || !one.get<std::string>().starts_with("/volume"))
-            RefuseRow(place + ".folders", "not a folder on a volume");
+            RefuseDocument(place + ".folders", "not a folder on a volume");
         const std::string target = one;
         const int32_t folder = FolderAt(id, target, place + ".folders");
         const std::string link = SettingOf(folder).szLink, bound = SettingOf(folder).szVolume;

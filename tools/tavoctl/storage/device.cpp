@@ -184,12 +184,9 @@ bool MayRead(const std::string &disk, bool wake)
 void RefuseToWake(const std::string &disk, bool wake, const std::string &attempted)
 {
     const Power power = wake ? Power::spinning : PowerOf(disk);
-    if (power != Power::spinning)
-        throw Failure{.attempted = attempted,
-                      .reason =
-                          disk + (power == Power::standby ? " is in standby" : " does not report whether it sleeps"),
-                      .hint = "--wake reads it anyway",
-                      .status = exit_failed};
+    FailIf(power != Power::spinning, attempted,
+           disk + (power == Power::standby ? " is in standby" : " does not report whether it sleeps"),
+           "--wake reads it anyway");
 }
 
 void RefuseToWakeAny(bool wake, const std::string &attempted)

@@ -58,7 +58,7 @@ struct Mount {
     std::string type;  // "ext4"
 };
 
-// /proc/mounts.
+// Throws a Failure when they cannot be read: a device whose users are not known must not count as free.
 std::vector<Mount> Mounts();
 
 // Returns why a device must not be overwritten, such as "/dev/sda1 is mounted on /mnt"; empty when it is unused.

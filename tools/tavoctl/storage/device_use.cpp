@@ -1,16 +1,18 @@
 // Finds the user of a block device: a mount, swap, an array, a volume, or a program that has opened it exclusively.
 #include "tavo_error.h"
 
+#include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/files.h"
 #include "storage/device.h"
 
 #include <cerrno>
+#include <cstdio>
 #include <filesystem>
-#include <fstream>
-#include <sstream>
+#include <memory>
 
 #include <fcntl.h>
+#include <mntent.h>
 #include <sys/stat.h>
 #include <sys/sysmacros.h>
 
@@ -33,10 +35,7 @@ std::string MountOf(dev_t number)
     for (const Mount &mount : Mounts())
         if (DeviceNumber(mount.source) == number)
             return " is mounted on " + mount.place;
-    std::ifstream swaps("/proc/swaps");
-    std::string line;
-    std::getline(swaps, line);  // the heading
-    while (std::getline(swaps, line))
+    for (const std::string &line : Split(FileText("/proc/swaps"), '\n'))
         if (DeviceNumber(line.substr(0, line.find_first_of(" \t"))) == number)
             return " is swap space";
     return "";
@@ -62,14 +61,11 @@ bool IsClaimed(const std::string &path)
 
 std::vector<Mount> Mounts()
 {
+    const std::unique_ptr<std::FILE, By<::endmntent>> file(::setmntent("/proc/self/mounts", "re"));
+    FailIf(!file, "list the mounted file systems", "/proc/self/mounts cannot be read");
     std::vector<Mount> mounts;
-    std::ifstream file("/proc/mounts");
-    for (std::string line; std::getline(file, line);) {
-        Mount mount;
-        std::istringstream words(line);
-        if (words >> mount.source >> mount.place >> mount.type)
-            mounts.push_back(mount);
-    }
+    while (const mntent *mount = ::getmntent(file.get()))
+        mounts.push_back({mount->mnt_fsname, mount->mnt_dir, mount->mnt_type});
     return mounts;
 }
 
@@ -98,8 +94,8 @@ void RefuseUsed(const std::vector<std::string> &devices, const std::string &atte
     for (const std::string &device : devices) {
         if (!DeviceNumber(device))
             throw NotFound(attempted + ": " + device, ERR_FILE_NOT_FOUND, "check the name");
-        if (const std::string use = UseOf(device); !use.empty())
-            throw Failure{.attempted = attempted, .reason = use, .hint = "free it first", .status = exit_busy};
+        const std::string use = UseOf(device);
+        BusyIf(!use.empty(), attempted, use, "free it first");
     }
 }
 

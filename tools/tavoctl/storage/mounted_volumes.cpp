@@ -1,16 +1,12 @@
 // The volumes that are mounted.
 #include "storage/mounted_volumes.h"
 
-#include "frame/containers.h"
 #include "frame/failure.h"
 #include "frame/lists.h"
 #include "frame/text.h"
+#include "storage/device.h"
 
-#include <cstdio>
 #include <map>
-#include <memory>
-
-#include <mntent.h>
 
 namespace tavoctl {
 namespace {
@@ -27,12 +23,10 @@ int VolumeNumber(std::string_view path)
 
 std::vector<MountedVolume> MountedVolumes()
 {
-    const std::unique_ptr<std::FILE, By<::endmntent>> mounts(::setmntent("/proc/self/mounts", "re"));
-    FailIf(!mounts, "list the mounted volumes", "/proc/self/mounts cannot be read");
     std::map<int, MountedVolume> found;
-    while (const mntent *mount = ::getmntent(mounts.get()))
-        if (const int number = VolumeNumber(mount->mnt_dir); number > 0)
-            found[number] = {number, mount->mnt_dir, mount->mnt_fsname};  // the last mount covers the earlier ones
+    for (const Mount &mount : Mounts())
+        if (const int number = VolumeNumber(mount.place); number > 0)
+            found[number] = {number, mount.place, mount.source};  // the last mount covers the earlier ones
     return Mapped(found, [](const auto &one) { return one.second; });
 }
 
@@ -41,8 +35,7 @@ MountedVolume FindVolume(int number)
     for (const MountedVolume &volume : MountedVolumes())
         if (volume.number == number)
             return volume;
-    throw Failure{
-        .attempted = "find volume " + std::to_string(number), .reason = "it is not mounted", .status = exit_not_found};
+    throw Absent("find volume " + std::to_string(number), "it is not mounted");
 }
 
 const ArgumentKind volume_kind = {

@@ -140,10 +140,7 @@ Action PartitionLayout(Arguments &in)
             if (BlTAVOCheckPartitionLayout(path.c_str(), raid, &version) == 1)
                 return call.One(disk_layout_columns, DiskLayout{path, version, raid});
         }
-        throw Failure{.attempted = attempted,
-                      .reason = "its partitions are none of the system's",
-                      .hint = "tavoctl partition list shows them",
-                      .status = exit_not_found};
+        throw Absent(attempted, "its partitions are none of the system's", "tavoctl partition list shows them");
     };
 }
 

@@ -95,19 +95,20 @@ class Tree {
 
     void AddDisk(const DiskFacts &disk)
     {
-        Node node = {.name = DeviceName(disk.path), .kind = "disk"};
-        node.bay = disk.bay;
-        node.model = disk.model;
-        node.serial = disk.serial;
-        node.size = disk.size;
-        node.state = disk.State();
+        Node node = {.name = DeviceName(disk.path),
+                     .kind = "disk",
+                     .size = disk.size,
+                     .bay = disk.bay,
+                     .model = disk.model,
+                     .serial = disk.serial,
+                     .state = disk.State()};
         const std::string name = node.name;
         LookAt(node, disk.path);
         const int row = Add(std::move(node), -1);
         AddArrayOf(disk.path, row);
         for (const std::string &partition : PartitionsOf(disk.path)) {
-            Node part = {.name = DeviceName(partition), .kind = "partition", .parents = {name}};
-            part.size = SizeOf(partition);
+            Node part = {
+                .name = DeviceName(partition), .kind = "partition", .parents = {name}, .size = SizeOf(partition)};
             LookAt(part, partition);
             AddArrayOf(partition, Add(std::move(part), row));
         }
@@ -159,11 +160,11 @@ class Tree {
         for (const Volume &volume : volumes_) {
             if (!of_group(volume))
                 continue;
-            Node node = {.name = volume.device, .kind = "volume", .parents = {group}};
-            if (volume.size)
-                node.size = Bytes{*volume.size};
-            if (volume.available)
-                node.available = Bytes{*volume.available};
+            Node node = {.name = volume.device,
+                         .kind = "volume",
+                         .parents = {group},
+                         .size = volume.size,
+                         .available = volume.available};
             node.state = !volume.active ? "not active" : volume.mount.empty() ? "not mounted" : "mounted";
             node.mount = Maybe(volume.mount);
             for (const Mount &mount : mounts_)

@@ -17,14 +17,13 @@ constexpr Column<Volume> volume_columns[] = {
     {"group", field<&Volume::group>, "", in_details},
     {"devices", field<&Volume::devices>, "that it is on"},
     {"active", field<&Volume::active>, "the kernel has it", in_details},
-    {"size", [](const Volume &v) { return v.size ? std::optional(Bytes{*v.size}) : std::nullopt; }, "of the device"},
-    {"capacity", [](const Volume &v) { return v.capacity ? std::optional(Bytes{*v.capacity}) : std::nullopt; },
-     "of the mounted file system", in_details},
-    {"available", [](const Volume &v) { return v.available ? std::optional(Bytes{*v.available}) : std::nullopt; },
-     "for users"},
+    {"size", field<&Volume::size>, "of the device"},
+    {"capacity", field<&Volume::capacity>, "of the mounted file system", in_details},
+    {"available", field<&Volume::available>, "for users"},
     {"used",
      [](const Volume &v) {
-         return v.capacity && *v.capacity ? std::optional(100 - 100 * *v.available / *v.capacity) : std::nullopt;
+         return v.capacity && v.capacity->count ? std::optional(100 - 100 * v.available->count / v.capacity->count)
+                                                : std::nullopt;
      },
      "", in_list, "percent"},
 };

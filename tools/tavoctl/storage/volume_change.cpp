@@ -62,7 +62,7 @@ std::vector<std::vector<uint64_t>> NumbersOf(const std::string &group, const std
 // How large the volume will be, when the group is as large as its devices; it has no other volumes then.
 uint64_t SizeToCome(const Volume &volume, const std::string &attempted)
 {
-    uint64_t size = *volume.size;
+    uint64_t size = volume.size->count;
     bool first = true;
     for (const auto &row : NumbersOf(volume.group, attempted)) {
         const uint64_t extents = row[0] > row[1] ? (row[0] - row[1]) / row[3] : 0;
@@ -81,10 +81,7 @@ Volume FindStoredVolume(int number, const std::string &attempted)
         for (Volume &volume : ReadVolumes(all))
             if (volume.Number() == number)
                 return std::move(volume);
-    throw Failure{.attempted = attempted,
-                  .reason = "there is no volume " + std::to_string(number),
-                  .hint = "tavoctl volume list shows what is there",
-                  .status = exit_not_found};
+    throw Absent(attempted, "there is no volume " + std::to_string(number), "tavoctl volume list shows what is there");
 }
 
 ActiveVolume::ActiveVolume(const Volume &volume, const std::string &attempted)
@@ -211,14 +208,14 @@ Action VolumeGrow(Arguments &in)
         const uint64_t size = SizeToCome(volume, attempted);
         RefuseTooLarge(size, attempted);
         const auto system = ReadExtFileSystem(volume.device);
-        call.Change(volume.mount, "size", Bytes{*volume.size}, Bytes{size});
+        call.Change(volume.mount, "size", volume.size, Bytes{size});
         // An interrupted attempt may have left the file system smaller than the device.
         constexpr uint64_t block = 4096;
-        if (system && system->size + block <= *volume.size)
+        if (system && system->size + block <= volume.size->count)
             call.Change(volume.mount, "file system", Bytes{system->size}, Bytes{size});
         if (!call.Proceed())
             return;
-        if (size > *volume.size) {
+        if (size > volume.size->count) {
             Must(LVMPvExpand(group.get()) == 0, attempted, log_hint);
             RunTool({"/sbin/lvextend", "-l", "+100%FREE", volume.device}, attempted);
         }

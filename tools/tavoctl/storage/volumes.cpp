@@ -50,8 +50,8 @@ void LookAtMount(Volume &volume)
     struct statvfs facts;
     if (volume.mount.empty() || ::statvfs(volume.mount.c_str(), &facts) != 0)
         return;
-    volume.capacity = uint64_t{facts.f_blocks} * facts.f_frsize;
-    volume.available = uint64_t{facts.f_bavail} * facts.f_frsize;
+    volume.capacity = Bytes{uint64_t{facts.f_blocks} * facts.f_frsize};
+    volume.available = Bytes{uint64_t{facts.f_bavail} * facts.f_frsize};
 }
 
 std::optional<Volume> ReadMapped(const std::string &block)
@@ -63,7 +63,7 @@ std::optional<Volume> ReadMapped(const std::string &block)
     Volume volume = {split->first, "/dev/" + split->first + "/" + split->second, {}, true, {}, {}, {}, {}};
     volume.devices = FolderNames(block + "/slaves");
     std::sort(volume.devices.begin(), volume.devices.end());
-    volume.size = std::stoull(KernelText(block + "/size").value_or("0")) * 512;
+    volume.size = Bytes{std::stoull(KernelText(block + "/size").value_or("0")) * 512};
     LookAtMount(volume);
     return volume;
 }

@@ -2,6 +2,8 @@
 #ifndef TAVOCTL_VOLUMES_H
 #define TAVOCTL_VOLUMES_H
 
+#include "frame/column.h"
+
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -10,13 +12,13 @@
 namespace tavoctl {
 
 struct Volume {
-    std::string group;                            // "vg1"
-    std::string device;                           // "/dev/vg1/lv"
-    std::vector<std::string> devices;             // under the group: "md2"
-    bool active;                                  // the kernel has it
-    std::optional<uint64_t> size;                 // bytes, of the device
-    std::string mount;                            // empty: not mounted
-    std::optional<uint64_t> capacity, available;  // bytes, of the mounted file system
+    std::string group;                         // "vg1"
+    std::string device;                        // "/dev/vg1/lv"
+    std::vector<std::string> devices;          // under the group: "md2"
+    bool active;                               // the kernel has it
+    std::optional<Bytes> size;                 // of the device
+    std::string mount;                         // empty: not mounted
+    std::optional<Bytes> capacity, available;  // of the mounted file system
 
     // Of "vg1": 1; nothing for a group of another name.
     std::optional<int> Number() const;
