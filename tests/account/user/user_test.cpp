@@ -408,6 +408,30 @@ TEST(UserFollowUp, FoldersListsAndServices)
     EXPECT_EQ(test::ReadFile("/etc/rsyncd.secrets"), "other:secret\n");
 }
 
+// A folder that is not there is not worth a line; one that cannot be looked for is.
+TEST(UserFollowUp, LogsWhoseHomeCannotBeLookedFor)
+{
+    test::WriteFile("/etc/tavoinfo.conf", "userHomeEnable=\"yes\"\n");
+    test::WriteFile("/usr/tavo/etc/share.conf", "[homes]\npath=/volume8/homes\n");
+    std::filesystem::create_directories("/volume8");
+    std::filesystem::remove("/var/services/homes");
+    ASSERT_EQ(::symlink("/volume8/homes", "/var/services/homes"), 0);
+    for (const bool is_loop : {false, true}) {
+        ASSERT_EQ(AddUser({.name = "alice"}), 0);
+        if (is_loop) {
+            ASSERT_EQ(::symlink("homes", "/volume8/homes"), 0);
+        }
+        test::CapturedLog log;
+        const auto is_logged = [&](const char *line) {
+            return log.Take().find(line) != std::string::npos;
+        };
+        ASSERT_EQ(test::Rename("alice", "carol"), 0);
+        EXPECT_EQ(is_logged("user_set:# Failed to look for the home folder of [alice], errno=40"), is_loop);
+        ASSERT_EQ(test::DeleteUser("carol"), 0);
+        EXPECT_EQ(is_logged("user_delete:# Failed to look for the home folder of [carol], errno=40"), is_loop);
+    }
+}
+
 // A locked account opens with its old password or a new one only; what cannot be done changes nothing.
 TEST(UserLock, RefusalsAndTheWayBack)
 {
@@ -541,6 +565,33 @@ TEST(UserSetPasswd, StoresOnlyWhatIsAHash)
     EXPECT_EQ(AllFiles(), before);
     EXPECT_EQ(set(alice.get(), "$1$a", hex.c_str(), hex.c_str()), ERR_SUCCESS);
     EXPECT_STREQ(GetUser("alice")->szPasswd, "$1$a");
+    const TAVOUSER *const none = nullptr;
+    const char *const text = "";
+    EXPECT_EQ(TAVOUserSetPasswd(&none, &text, &text, &text, 0), 0) << "nothing to do";
+
+    // Programs that open the stores themselves read texts with their NUL, and the time of the file.
+    const std::pair<const char *, const char *> stores[] = {{TAVO_USER_DB_NAME, "/etc/passwd"},
+                                                            {TAVO_USER_DB_SHADOW, "/etc/shadow"},
+                                                            {TAVO_USER_DB_MISC, "/etc/tavouser.conf"},
+                                                            {TAVO_USER_DB_SMB, "/usr/tavo/etc/private/smbpasswd"}};
+    for (const auto &[path, file] : stores) {
+        TAVOBDB *const store = TAVOBDbOpen(path, O_RDONLY, 1);
+        void *value = nullptr;
+        int length = 0;
+        ASSERT_EQ(TAVOBDbGet(store, "ALICE", 6, &value, &length), 0) << path;
+        EXPECT_EQ(std::string(static_cast<char *>(value), static_cast<size_t>(length)), LineOf(file, "alice") + '\0');
+        TAVOBDbFree(value);
+        int32_t time = 0;
+        struct stat st;
+        ASSERT_EQ(::stat(file, &st), 0);
+        EXPECT_EQ(TAVOBDbConfSyncTimeGet(store, &time), 0) << path;
+        EXPECT_EQ(time, static_cast<int32_t>(st.st_mtime)) << path;
+        EXPECT_EQ(TAVOBDbClose(store), 0);
+    }
+    TAVOBDB *const names = TAVOBDbOpen(TAVO_USER_DB_NAME, O_RDWR, 1);
+    EXPECT_EQ(TAVOBDbSet(names, "ODD", 4, "not an account", 15), 0);
+    EXPECT_EQ(TAVOBDbClose(names), 0);
+    EXPECT_EQ(AddUser({.name = "bob"}), ERR_FORMAT_ERROR);
     EXPECT_EQ(FaultOf(TAVOUserSetPasswd(nullptr, nullptr, nullptr, nullptr, 1)),
               (Fault{ERR_BAD_PARAMETERS, "user_set_passwd"}));
 }

@@ -161,6 +161,8 @@ TEST(HashSteps, WorkAlone)
     EXPECT_EQ(TLIBICopyHash(copy.get(), hash.get()), -1) << "the keys are there already";
     const Hash small(PshTLIBIHashAllocator(40, 30));
     EXPECT_EQ(TLIBICopyHash(small.get(), hash.get()), -1);
+    EXPECT_EQ(TLIBICopyHash(Hash(PshTLIBIHashAllocator(4, 30)).get(), MakeHash({{"", "x"}}).get()), 0)
+        << "a pair of the first slot";
 
     EXPECT_EQ(PshTLIBIReSizeHash(hash.get(), 18, 1000), nullptr);
     EXPECT_EQ(PshTLIBIReSizeHash(hash.get(), 40, 100), nullptr);

@@ -96,7 +96,7 @@ const Row kRows[] = {
     {IS(TLIBStrEncodeColon("a:b", w.buffer, 16) > 0), {}, 0},
 };
 
-TEST(ContainerFault, EveryAllocationFailsOnce)
+TEST(ContainerFault, ReportsEachRefusedAllocationAndChangesNothing)
 {
     for (const Row &row : kRows) {
         SCOPED_TRACE(row.name);

@@ -26,35 +26,26 @@ struct Argument {
     std::vector<T> bad;
 };
 
-// The module, and a published line after a colon.
-test::Fault BadParameters(const std::string &place)
-{
-    const size_t colon = std::min(place.find(':'), place.size());
-    return {ERR_BAD_PARAMETERS, place.substr(0, colon), std::atoi(place.c_str() + std::min(colon + 1, place.size()))};
-}
-
-template <typename Result, typename... Types>
-void Refuses(const char *module, Result (*function)(Types...), std::type_identity_t<Argument<Types>>... arguments)
-{
-    const auto spoil = [&]<size_t at>(std::integral_constant<size_t, at>, const auto &argument) {
-        for (size_t i = 0; i < argument.bad.size(); ++i) {
-            std::tuple<Types...> values(arguments.good...);
-            std::get<at>(values) = argument.bad[i];
-            test::ForgetFault();
-            const Result result = std::apply(function, values);
-            EXPECT_EQ(test::LastFault(), BadParameters(module)) << "argument " << at << ", value " << i;
-            if constexpr (std::is_pointer_v<Result>)
-                EXPECT_EQ(result, nullptr) << module;
-            else
-                EXPECT_TRUE(result == 0 || result == static_cast<Result>(-1)) << module << " returns " << result;
-        }
-    };
-    [&]<size_t... at>(std::index_sequence<at...>)
+// What a function reports: a code under its module, or under "module:line" where the line is published, a text in the log,
+// or both.
+struct Refusal {
+    Refusal(const char *place, const char *log = "") : Refusal(place, ERR_BAD_PARAMETERS, log) {}
+    Refusal(const char *place, int code, const char *log)
     {
-        (spoil(std::integral_constant<size_t, at>(), arguments), ...);
+        const std::string_view text = place;
+        const size_t colon = std::min(text.find(':'), text.size());
+        module = text.substr(0, colon);
+        if (code != 0)
+            fault = {code, module, colon < text.size() ? std::atoi(place + colon + 1) : 0};
+        if (*log)
+            line = module + log;
     }
-    (std::index_sequence_for<Types...>());
-}
+
+    std::string module, line;
+    test::Fault fault;
+};
+
+constexpr const char *kBad = ":# Bad parameters";
 
 char text[64] = "";
 unsigned char bytes[512] = {};
@@ -73,8 +64,36 @@ class Refusals : public testing::Test {
         TLIBSzHashFree(hash_);
     }
 
+    template <typename Result, typename... Types>
+    void Refuses(const Refusal &refusal, Result (*function)(Types...),
+                 std::type_identity_t<Argument<Types>>... arguments)
+    {
+        const auto spoil = [&]<size_t at>(std::integral_constant<size_t, at>, const auto &argument) {
+            for (size_t i = 0; i < argument.bad.size(); ++i) {
+                std::tuple<Types...> values(arguments.good...);
+                std::get<at>(values) = argument.bad[i];
+                test::ForgetFault();
+                log_.Clear();
+                const Result result = std::apply(function, values);
+                EXPECT_EQ(test::LastFault(), refusal.fault) << refusal.module << ", argument " << at << ", value " << i;
+                EXPECT_EQ(log_.Take(), refusal.line);
+                if constexpr (std::is_pointer_v<Result>)
+                    EXPECT_EQ(result, nullptr) << refusal.module;
+                else
+                    EXPECT_TRUE(result == 0 || result == static_cast<Result>(-1))
+                        << refusal.module << " returns " << result;
+            }
+        };
+        [&]<size_t... at>(std::index_sequence<at...>)
+        {
+            (spoil(std::integral_constant<size_t, at>(), arguments), ...);
+        }
+        (std::index_sequence_for<Types...>());
+    }
+
     TLIBSZLIST *list_ = PslTLIBSzListAlloc(64);
     TLIBSZHASH *hash_ = PshTLIBSzHashAlloc(64);
+    test::CapturedLog log_;
 };
 
 TEST_F(Refusals, Core)
@@ -117,7 +136,7 @@ TEST_F(Refusals, Core)
     Refuses("unicode_utf8_str_count_char", TLIBUnicodeUTF8StrCountChar, {"a", "\xff"});
     Refuses("list_and:59", PslTLIBSzListAnd, list_, list_, 0);
     Refuses("list_case_find:46", TLIBSzListCaseFind, list_, "a");
-    Refuses("list_dump_2_str:36", TLIBSzListDump2Str, list_, ",", text, {64, 0});
+    Refuses({"list_dump_2_str:36", ":# Parameter error"}, TLIBSzListDump2Str, list_, ",", text, {64, 0});
     Refuses("list_expand", PslTLIBISzListExpand, list_);
     Refuses("list_find:37", TLIBSzListFind, list_, "a");
     Refuses("list_find", TLIBISzListFind, list_, 0, 0, "a", 0);
@@ -170,7 +189,7 @@ TEST_F(Refusals, Storage)
     Refuses("disk_partition_num_get", TAVODiskPartitionNumGet, "/dev/none1", text, {64, 1});
     Refuses("disk_raw_open", TAVOIDiskRawOpen, "/dev/none");
     Refuses("disk_reset", TAVOIDiskReset, "/dev/none");
-    Refuses("disk_set_disk_standby", TAVOIDiskSetDiskStandby, "/dev/none");
+    Refuses({"disk_set_disk_standby", ":# argument should not be NULL"}, TAVOIDiskSetDiskStandby, "/dev/none");
     Refuses("disk_set_disk_standby_timer", TAVOIDiskSetDiskStandbyTimer, "/dev/none", {0, -1, 256});
     Refuses("disk_set_file_sb_timer_setting", TAVODiskSetFileSBTimerSetting, {0, -1});
     Refuses("disk_size_get", DiskSizeGet, "/dev/none", &number64);
@@ -179,12 +198,12 @@ TEST_F(Refusals, Storage)
     Refuses("disk_write_cache_set", TAVODiskWriteCacheSet, "/dev/none", 0);
     Refuses("lnx_disk_get_model", TAVOLnxDiskGetModel, {"/dev/none", "none"}, text, {64, 0});
     Refuses("smart_data_read", SmartDataRead, "/dev/none", bytes, 0);
-    Refuses("raid_add", RAIDAdd, {good, bad}, {"/dev/sda3", "sda3"});
+    Refuses({"raid_add", kBad}, RAIDAdd, {good, bad}, {"/dev/sda3", "sda3"});
     Refuses("raid_add_robust_check", RAIDAddRobustCheck, good, {"/dev/sda3", "sda3"});
-    Refuses("raid_assemble", RAIDAssemble, {"/dev/md2", "/dev/sda"}, {"0:0:0:0", "", "none"});
-    Refuses("raid_assemble_by_info", RAIDAssembleByInfo, {good, bad});
-    Refuses("raid_bad_sector_remap", RAIDBadSectorRemap, {"/dev/md2", "/dev/sda"}, 0);
-    Refuses("raid_dev_count_change", RAIDDevCountChange, {good, bad}, {2, 0});
+    Refuses({"raid_assemble", kBad}, RAIDAssemble, {"/dev/md2", "/dev/sda"}, {"0:0:0:0", "", "none"});
+    Refuses({"raid_assemble_by_info", kBad}, RAIDAssembleByInfo, {good, bad});
+    Refuses({"raid_bad_sector_remap", kBad}, RAIDBadSectorRemap, {"/dev/md2", "/dev/sda"}, 0);
+    Refuses({"raid_dev_count_change", kBad}, RAIDDevCountChange, {good, bad}, {2, 0});
     Refuses("raid_disk_is_used_by_raid", RAIDDiskIsUsedByRAID, {"/dev/sda", "sda3"}, {MayBeNull(), nullptr});
     Refuses("raid_expansible", RAIDExpansible, good, &number64);
     Refuses("raid_info_dup", RAIDInfoDup, good);
@@ -193,25 +212,78 @@ TEST_F(Refusals, Storage)
     Refuses("raid_ioctl_status", RAIDIoctlStatus, {0, -1}, &number);
     Refuses("raid_list_push", RAIDListPush, &arrays, {MayBeNull(), nullptr, nullptr});
     Refuses("raid_list_search", RAIDListSearch, {MayBeNull(), nullptr}, "/dev/md2", &found);
-    Refuses("raid_md_stripe_cache_size_set", TAVORAIDMdStripeCacheSizeSet, {"/dev/md2", "/dev/sda"}, {1, 0});
-    Refuses("raid_md_tuning_performance", TAVORAIDMdTuningPerformance, {"/dev/md2", "/dev/sda"});
-    Refuses("raid_migrate2_raid6", RAIDMigrate2RAID6, {good, bad}, list_);
+    Refuses({"raid_md_stripe_cache_size_set", kBad}, TAVORAIDMdStripeCacheSizeSet, {"/dev/md2", "/dev/sda"}, {1, 0});
+    Refuses({"raid_md_tuning_performance", ":# illegal device path: NULL "}, TAVORAIDMdTuningPerformance, "/dev/md2");
+    Refuses({"raid_md_tuning_performance", ":# illegal device path: /dev/sda "}, TAVORAIDMdTuningPerformance,
+            {MayBeNull(), "/dev/md2", "/dev/sda"});
+    Refuses({"raid_migrate2_raid6", kBad}, RAIDMigrate2RAID6, {good, bad}, list_);
     Refuses("raid_path_enum", RAIDPathEnum, {&list_, &no_list});
     Refuses("raid_rebuild_status_get", RAIDRebuildStatusGet, {0, -1}, &progress);
     Refuses("raid_rebuilding_multi_wait", RAIDRebuildingMultiWait, list_);
     Refuses("raid_rebuilding_wait", RAIDRebuildingWait, {"/dev/md2", "/dev/sda"});
-    Refuses("raid_remove", RAIDRemove, {good, bad});
-    Refuses("raid_remove_disk", RAIDRemoveDisk, {good, bad}, {"/dev/sda3", "sda3"});
+    Refuses({"raid_remove", kBad}, RAIDRemove, {good, bad});
+    Refuses({"raid_remove_disk", kBad}, RAIDRemoveDisk, {good, bad}, {"/dev/sda3", "sda3"});
     Refuses("raid_remove_multiple", RAIDRemoveMultiple, list_);
-    Refuses("raid_replace_disk", RAIDReplaceDisk, {good, bad}, {MayBeNull(), nullptr, "sda3"},
+    Refuses({"raid_replace_disk", kBad}, RAIDReplaceDisk, {good, bad}, {MayBeNull(), nullptr, "sda3"},
             {"/dev/sda", "sda3", "/dev/sda3"});
     Refuses("raid_sb_clean", RAIDSBClean, {"/dev/sda3", "sda3"});
-    Refuses("raid_sb_clean_by_uuid", RAIDSBCleanByUUID, {MayBeNull(), nullptr}, {"0:0:0:0", "", "none"});
+    Refuses({"raid_sb_clean_by_uuid", kBad}, RAIDSBCleanByUUID, {MayBeNull(), nullptr}, {"0:0:0:0", "", "none"});
     Refuses("raid_sb_enum", RAIDSBEnum, list_, &entry);
     Refuses("raid_sb_get", RAIDSBGet, {"/dev/sda3", "sda3"}, &superblock);
     Refuses("raid_size_unalloc_get", RAIDSizeUnallocGet, good, &number64);
-    Refuses("raid_stop", RAIDStop, {"/dev/md2", "/dev/sda"});
+    Refuses({"raid_stop", kBad}, RAIDStop, {"/dev/md2", "/dev/sda"});
     Refuses("raid_uuid_get", RAIDUUIDGet, {MayBeNull(), "/dev/md2"}, text, {64, 0});
+}
+
+// These log a bad argument without a code.
+TEST_F(Refusals, StorageWithoutACode)
+{
+    TLIBSZLIST *names = PslTLIBSzListAlloc(64), *none = PslTLIBSzListAlloc(64);
+    TLIBSzListPush(&list_, "/dev/sda3");
+    TLIBSzListPush(&names, "sda3");
+    const TLIBSZLIST *const devices = list_, *const bad = names, *const empty = none;
+    LVMPVLIST *volumes = nullptr;
+    LVMPV volume;
+    LVMVG group = {}, unnamed = {};
+    std::strcpy(group.szUuid, "x");
+    LVMVGINFO info = {}, *found = nullptr;
+    const LVMVGINFO no_devices = {};
+    info.pslPvs = list_;
+    const LVMVGKEY key = {};
+    const PARTITIONFILTER filter = {};
+    const auto logs = [](const char *module) {
+        return Refusal(module, 0, kBad);
+    };
+
+    Refuses(logs("lvm_create"), LVMCreate, {devices, bad, empty}, {"/dev/vg1", "vg1"}, {"lv", "-lv"},
+            {MayBeNull(), text}, {64, 0});
+    Refuses(logs("lvm_vg_create"), LVMVgCreate, {"/dev/vg1", "vg1"}, {devices, bad, empty});
+    Refuses(logs("lvm_lv_create"), LVMLvCreate, {"/dev/vg1", "vg1"}, {"lv", "-lv"});
+    Refuses(logs("lvm_pv_create"), LVMPvCreate, {"/dev/sda3", "sda3"});
+    Refuses(logs("lvm_pv_sb_list_push"), LVMPvSBListPush, &volumes, &volume);
+    Refuses(logs("lvm_vg_remove"), LVMVgRemove, {"/dev/vg1", "/etc"});
+    Refuses(logs("lvm_vg_sb2_info"), LVMVgSB2Info, {&group, &unnamed}, &info);
+    Refuses(logs("lvm_pv_sb_get"), LVMPvSBGet, {"/dev/sda3", "sda3"}, &volume);
+    Refuses(logs("lvm_pv_remove"), LVMPvRemove, {"/dev/sda3", "sda3"});
+    Refuses(logs("lvm_remove"), LVMRemove, {"/dev/vg1", "/etc"}, {"lv", "vg"});
+    Refuses(logs("lvm_vg_sb_get"), LVMVgSBGet, {"/dev/vg1", "/etc"}, &group);
+    Refuses(logs("lvm_pv_expand"), LVMPvExpand, {&info, &no_devices});
+    Refuses(logs("lvm_pv_sb_enum"), LVMPvSBEnum, &volumes);
+    Refuses(logs("lvm_vg_sb_list_search"), LVMVgSBListSearch, {MayBeNull(), nullptr}, &key, &found);
+    Refuses(logs("lvm_get_lv_path"), LVMGetLVPath, {"/dev/sda3", "sda3"}, text, {64, 0});
+    Refuses(logs("lvm_remove_lv"), LVMRemoveLV, {"/dev/sda3", "sda3"});
+    Refuses({"disk_container_get", 0, ":# bad paramters"}, DiskContainerGet, {"sda", "hda", "sd"}, &number);
+    Refuses(logs("partition_is_extended"), PartitionIsExtended, "/dev/sda3");
+    Refuses(logs("partition_clean_raid"), PartitionCleanRAID, {"/dev/sda", "sda"}, {1, 0});
+    Refuses(logs("partition_clean"), PartitionClean, {"/dev/sda", "sda"}, 0);
+    Refuses(logs("partition_table_type_get"), PartitionTableTypeGet, "/dev/none", &number);
+    Refuses(logs("check_special_device"), TAVOCheckSpecialDevice, "none");
+    Refuses(logs("partition_layout_get"), PartitionLayoutGet, &number);
+    Refuses(logs("partition_path_enum"), PartitionPathEnum, &filter, {&list_, &no_list});
+    Refuses(logs("partition_create"), PartitionCreate, {"/dev/sda", "sda"}, 0, {MayBeNull(), nullptr});
+    Refuses(logs("partition_add_table"), PartitionAddTable, {"/dev/sda", "sda"});
+    TLIBSzListFree(names);
+    TLIBSzListFree(none);
 }
 
 TEST_F(Refusals, Accounts)
@@ -275,8 +347,12 @@ TEST_F(Refusals, Network)
     static TAVONETLINKAGGR bond = {};
 
     Refuses("fhost_get2_hash", TAVOFHOSTGet2Hash, {&hash_, &no_hash});
-    Refuses("conf_get_mtu_value", TAVOConfGetMTUValue, {"eth0", "../x"}, text, {64, 0});
-    Refuses("conf_set_mtu_value", TAVOConfSetMTUValue, {"eth0", "../x"}, {1500, -1});
+    Refuses("conf_get_mtu_value", TAVOConfGetMTUValue, "eth0", text, {64, 0});
+    Refuses({"conf_get_mtu_value", ":# interface name is too long"}, TAVOConfGetMTUValue, {MayBeNull(), "eth0", "../x"},
+            {MayBeNull(), text}, 64);
+    Refuses("conf_set_mtu_value", TAVOConfSetMTUValue, "eth0", {1500, -1});
+    Refuses({"conf_set_mtu_value", ":# interface name is too long"}, TAVOConfSetMTUValue, {MayBeNull(), "eth0", "../x"},
+            1500);
     Refuses("lnx_get_hostname", TAVOLnxGetHostname, text, {64, 0});
     Refuses("lnx_is_dhcp", BlTAVOLnxIsDHCP, {"eth0", "../x"});
     Refuses("lnx_set_hostname", TAVOLnxSetHostname, "tavo");

@@ -91,6 +91,15 @@ int fstat(int fd, struct stat *st) noexcept
     return ::fstatat(fd, "", st, AT_EMPTY_PATH);
 }
 
+ssize_t read(int fd, void *data, size_t size)
+{
+    if (test::failing == Call::read) {
+        errno = test::failing_with;
+        return -1;
+    }
+    return ::syscall(SYS_read, fd, data, size);
+}
+
 ssize_t write(int fd, const void *data, size_t size)
 {
     if (test::Reached()) {

@@ -13,7 +13,7 @@ void DieAtCall(int n);
 // Before the n-th of these calls from now on the process stops (SIGSTOP).
 void StopAtCall(int n);
 
-enum class Call { none, fstat, write, fsync_file, fsync_directory, fchmod, fchown, rename, flock };
+enum class Call { none, fstat, read, write, fsync_file, fsync_directory, fchmod, fchown, rename, flock };
 
 // From now on these calls fail with this errno.
 void FailCalls(Call call, int error);

@@ -5,6 +5,7 @@
 #include "network/detail/ipv6_route_table.h"
 #include "network/detail/route_table.h"
 #include "network/detail/socket_table.h"
+#include "network/detail/undo_step.h"
 
 #include <gtest/gtest.h>
 
@@ -113,6 +114,25 @@ TEST(HostsFile, KeepsTheAdministratorsLines)
         "127.0.0.1\tlocalhost\n10.0.0.5\tnas\n# printers\n10.0.0.9 lp lp.local\n::1 localhost6\n");
     EXPECT_EQ(tavo::HostsWithName("10.0.0.4\tnas\n10.0.0.4\tnas alias\n", "", "nas", ""),
               "127.0.0.1\tlocalhost\n10.0.0.4\tnas alias\n");
+}
+
+// A record that a death cut off, or another program wrote, undoes nothing.
+TEST(UndoRecord, HasAllOfItsStepsOrNone)
+{
+    const auto steps = tavo::ParseUndo(tavo::UndoText(
+        {{tavo::UndoStep::file, "a b", "text\n", "644", true}, {tavo::UndoStep::command, "true", "", "", false}}));
+    ASSERT_TRUE(steps);
+    ASSERT_EQ(steps->size(), 2u);
+    EXPECT_EQ((*steps)[0].kind, tavo::UndoStep::file);
+    EXPECT_EQ((*steps)[0].target + "|" + (*steps)[0].value + "|" + (*steps)[0].more, "a b|text\n|644");
+    EXPECT_TRUE((*steps)[0].after_death);
+    EXPECT_FALSE((*steps)[1].after_death);
+    for (const char *text :
+         {"", "f 0 1 1 1\nabc\n", "fF 0 1 1 1\nabc\nend\n", "x 0 1 1 1\nabc\nend\n", " 0 1 1 1\nabc\nend\n",
+          "f 0 1 1\nabc\nend\n", "f 0 1 1 1 1\nabc\nend\n", "f 0 1 1 x\nabc\nend\n", "f 0 1x 1 1\nabc\nend\n",
+          "f 0 1 99 1\nabc\nend\n", "f 0 99 1 1\nabc\nend\n", "f 0 1 1 99\nabc\nend\n", "f 0 1 1 1\nabcd\nend\n",
+          "f 0 1 1 1\nabc"})
+        EXPECT_FALSE(tavo::ParseUndo(text)) << text;
 }
 
 TEST(InterfaceName, TakesOnlyWhatCanBeOne)

@@ -24,6 +24,7 @@ namespace {
 
 int steps_to_live = -1;    // the process dies before so many steps more are done
 int renames_to_fail = -1;  // the rename that fails, counted from 0
+int command_to_fail = -1;  // and the command
 
 void Step()
 {
@@ -119,6 +120,12 @@ TEST_F(Bond, IsTakenBackWhenItCannotBeMade)
         story_.Head("rename " + std::to_string(failing));
         TELL(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}));
         EXPECT_EQ(renames_to_fail, -1) << failing;
+    }
+    for (const int copy : {1, 2}) {  // after the stop
+        Plain();
+        command_to_fail = copy;
+        story_.Head("copy " + std::to_string(copy));
+        TELL(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}));
     }
     Plain();
     WriteFile("/var/standin/rc.network.status", "1");
@@ -241,6 +248,8 @@ pid_t waitpid(pid_t pid, int *status, int options)
     using Waitpid = pid_t(pid_t, int *, int);
     static Waitpid *const real = reinterpret_cast<Waitpid *>(::dlsym(RTLD_NEXT, "waitpid"));
     const pid_t result = real(pid, status, options);
+    if (result > 0 && status && command_to_fail >= 0 && command_to_fail-- == 0)
+        *status = 1 << 8;
     Step();
     return result;
 }

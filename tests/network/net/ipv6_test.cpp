@@ -153,10 +153,11 @@ TEST_F(NetIPv6, WakeOnLanIsPutBack)
     wake_.obeys = false;
     TELL(TAVONetWolSet("eth0", 1));
     wake_.obeys = true;
-    {
-        const test::LockHolder other(TAVO_LOCK_TAVOINFO | TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING);
-        TELL(TAVONetWolSet("eth0", 1));
-    }
+    // A shared lock of this process's own never becomes exclusive, so the calls do not wait.
+    ASSERT_EQ(ErrTLIBFileLock(TAVO_LOCK_TAVOINFO | TAVO_LOCK_SHARED, 0), 0);
+    TELL(TAVONetWolSet("eth0", 1));
+    TELL(TAVOConfSetMTUValue("eth0", 1400));
+    ErrTLIBFileUnlock(TAVO_LOCK_TAVOINFO);
     TELL(TAVONetCheckpointTake());
     TELL(TAVONetWolSet("eth0", 1));
     TELL(TAVONetCheckpointPutBack());
@@ -183,6 +184,7 @@ TEST_F(NetIPv6, ReportsWhyACardCannotWake)
         wake_.answers = row.answers;
         story_.Head(row.what);
         TELL(TAVONetWolSet("eth0", 1));
+        TELL(TAVONetWolGet("eth0"));
     }
 }
 

@@ -104,7 +104,10 @@ TEST_F(NetSettings, WithoutALeaseTheOldAddressComesBack)
 
 // A process under another program's name, where the DHCP client writes its number.
 struct Client : test::NamedProcess {
-    explicit Client(const char *name) : NamedProcess(name) { WriteFile(kPidFile, std::to_string(Pid()) + "\n"); }
+    explicit Client(const char *name, const char *argument = "none") : NamedProcess(name, argument)
+    {
+        WriteFile(kPidFile, std::to_string(Pid()) + "\n");
+    }
     ~Client() { ::unlink(kPidFile); }
 
     static constexpr const char *kPidFile = "/etc/dhcpc/dhcpcd-eth0.pid";
@@ -180,6 +183,8 @@ TEST_F(NetSettings, TheCardIsReadFromItsFileAndTheKernel)
     WriteFile(kIfcfg, "DEVICE=eth0\nBOOTPROTO=dhcp\n");
     TELL(TAVONetGetCard1(&card));
     EXPECT_EQ(card.nMode, TAVO_NET_DHCP);
+    tree_.Put("/sys/class/net/eth1/type/unreadable", "");
+    TELL(TAVONetGetCard1(&card));  // it may be the first one
     tree_.Remove("/sys/class/net");
     TELL(TAVONetGetCard1(&card));
 }
@@ -272,6 +277,7 @@ TEST_F(NetSettings, AHostsFileThatCannotBeWrittenFailsTheNameAlone)
     named_host.clear();
     TELL(TAVOLnxSetHostname("attic"));
     EXPECT_EQ(named_host, "");
+    TELL(TAVONetHostsRefresh());
     std::filesystem::remove("/etc/hosts");
 }
 
@@ -281,6 +287,42 @@ TEST_F(NetSettings, ANameThatTheKernelRefusesIsNotStored)
     refuses_name = true;
     TELL(TAVOLnxSetHostname("attic"));
     refuses_name = false;
+}
+
+// A checkpoint without one of the parts could not restore it.
+TEST_F(NetSettings, ACheckpointHasEveryPartOrIsNotTaken)
+{
+    WriteFile("/etc/hosts", "");
+    WriteFile("/etc/resolv.conf", "");
+    const std::filesystem::path kept = "/etc/kept";
+    for (const std::string path : {"/etc/sysconfig/network", "/etc/resolv.conf", "/etc/hosts", kIfcfg.c_str(),
+                                   "/etc/sysconfig/network-scripts"}) {
+        const bool is_folder = std::filesystem::is_directory(path);
+        std::filesystem::rename(path, kept);
+        if (is_folder)
+            WriteFile(path, "");
+        else
+            std::filesystem::create_directory(path);
+        EXPECT_EQ(TAVONetCheckpointTake(), -1) << path;
+        EXPECT_EQ(LastFault(), (test::Fault{ERR_READ_FAILED, "net_checkpoint_take"})) << path;
+        EXPECT_FALSE(std::filesystem::exists("/etc/network.checkpoint")) << path;
+        std::filesystem::remove(path);
+        std::filesystem::rename(kept, path);
+    }
+}
+
+// What was started since the checkpoint ends, and the client of that time goes on.
+TEST_F(NetSettings, ACheckpointKeepsItsClient)
+{
+    WriteFile(kIfcfg, "DEVICE=eth0\nBOOTPROTO=dhcp\n");
+    Client client("/sbin/dhcpcd", "eth0");
+    EXPECT_EQ(TAVONetCheckpointTake(), 0);
+    tree_.Put("/sys/class/net/eth0/mtu", "1400\n");
+    test::NamedProcess late("/sbin/dhcpcd", "eth0"), other("/sbin/dhcpcd", "eth1");
+    EXPECT_EQ(TAVONetCheckpointPutBack(), 0);
+    EXPECT_EQ(late.End(), SIGKILL);
+    EXPECT_EQ(other.End(), 0);
+    EXPECT_EQ(client.End(), 0);
 }
 
 TEST_F(NetSettings, TheMtuHasAKeyForEachInterface)

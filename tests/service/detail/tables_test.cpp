@@ -70,10 +70,11 @@ TEST(ServiceTables, ArePrintedInThePage)
     for (int id = 1; id < tavo::kServiceShares; ++id) {
         const tavo::ServiceShareRow &whole = tavo::service_share_table[id];
         const TAVOSERVICESHARE &row = whole.share;
-        EXPECT_THAT(kPage, testing::HasSubstr("\n| " + std::to_string(id) + " | " + Code(row.szShare) + " | " +
-                                              Code(row.szLink) + " | " + Code(row.szEnableKey) + " | " +
-                                              (row.fSupported ? "yes" : "by the model") + " | " +
-                                              Code(namings[row.nNaming]) + " | " + Capabilities(whole) + " |\n"));
+        EXPECT_THAT(kPage, testing::HasSubstr(
+                               "\n| " + std::to_string(id) + " | " + Code(row.szShare) + " | " + Code(row.szLink) +
+                               " | " + Code(row.szEnableKey) + " | " + (row.fSupported ? "yes" : "by the model") +
+                               " | " + Code(namings[row.nNaming]) + " | " + std::to_string(row.nAttributeA) + ", " +
+                               std::to_string(row.nAttributeB) + " | " + Capabilities(whole) + " |\n"));
     }
 }
 
