@@ -2,6 +2,7 @@
 #include "account/detail/account_name.h"
 #include "account/detail/btree.h"
 #include "account/detail/colon_fields.h"
+#include "account/detail/commit_marker.h"
 #include "account/detail/id_index.h"
 #include "account/detail/misc_line.h"
 #include "account/detail/passwd_line.h"
@@ -195,6 +196,65 @@ TEST(UserTexts, ForeignFilesKeepTheirAccounts)
     const auto unmarked = tavo::UserStoreEntries({.passwd = "a:x:1050:1:::\nb:x:3073:1:::\nc:x:1040:1:::\n"});
     EXPECT_EQ(unmarked[tavo::kUidStore].at("#CURRENT_UID"), tavo::NumberBytes(1050)) << "the highest in range";
     EXPECT_EQ(tavo::UserStoreEntries({})[tavo::kUidStore].at("#CURRENT_UID"), tavo::NumberBytes(1023));
+}
+
+// The steps of a change, which another process may have to complete.
+TEST(CommitMarker, ReadsWhatItWrites)
+{
+    tavo::Marker marker;
+    EXPECT_TRUE(marker.IsEmpty());
+    marker.files = {{tavo::kSambaLists, "/tmp/a b", "/etc/x%", "1:2:3.4", "-"}};
+    EXPECT_FALSE(marker.HasMoreThanFiles() || marker.IsEmpty());
+    marker.names = {{true, 6, 0, "old name", ""}, {false, 9, 0, "a", "b"}};
+    EXPECT_FALSE(marker.HasMoreThanFiles());
+    marker.MakePending(tavo::kShareLists);
+    EXPECT_TRUE(marker.HasMoreThanFiles());
+    using Home = tavo::HomeStep;
+    marker.homes = {
+        {Home::kMake, "a", "", 1000, 100, 0}, {Home::kMove, "a", "b", -1, -1, 7}, {Home::kRemove, "c", "", -1, -1, 0}};
+    marker.stages = {"/volume1/@tmp/\x7F\xC3\xA4!"};
+    const std::string text = "file 1 /tmp/a%20b /etc/x%25 1:2:3.4 -\n"
+                             "name group 6 2 old%20name %\nname user 9 0 a b\n"
+                             "home make a % 1000 100 0\nhome move a b -1 -1 7\nhome remove c % -1 -1 0\n"
+                             "stage /volume1/@tmp/%7F\xC3\xA4!\nend\n";
+    EXPECT_EQ(tavo::FormatMarker(marker), text);
+    tavo::Marker read;
+    ASSERT_TRUE(tavo::ParseMarker(text + "after\n", read));
+    EXPECT_EQ(read.names[0].old_name + "|" + read.names[0].new_name, "old name|");
+    EXPECT_EQ(tavo::FormatMarker(read), text);
+    read.DropDone();
+    ASSERT_EQ(read.names.size(), 1u);
+    EXPECT_EQ(read.names[0].targets, 2u);
+    for (const std::string line :
+         {"", "what a b", "file 1 /a /b 1:2:3.4", "file 1 /a /b 1:2:3.4 - -", "name group 6 2 a", "name user 6 2 a b c",
+          "home make a % 1 2", "home make a % 1 2 3 4", "stage", "stage /a b"}) {
+        EXPECT_FALSE(tavo::ParseMarker("stage /a\n" + line + "\nend\n", read)) << line;
+        EXPECT_TRUE(read.IsEmpty()) << line;
+    }
+    EXPECT_FALSE(tavo::ParseMarker(text.substr(0, text.size() - 4), read)) << "cut short";
+
+    // A second one takes the place of the first, and only root's counts.
+    for (const bool durable : {false, true}) {
+        EXPECT_TRUE(tavo::WriteMarker(text, durable));
+        EXPECT_EQ(test::ReadFile(tavo::kCommitMarker), text);
+    }
+    EXPECT_EQ(tavo::ReadMarker(read), 0);
+    EXPECT_EQ(tavo::FormatMarker(read), text);
+    for (const mode_t mode : {0620, 0602}) {
+        ASSERT_EQ(::chmod(tavo::kCommitMarker, mode), 0);
+        EXPECT_EQ(tavo::ReadMarker(read), 0);
+        EXPECT_TRUE(read.IsEmpty());
+        EXPECT_FALSE(tavo::MarkerStands());
+        test::WriteFile(tavo::kCommitMarker, text);
+    }
+    test::WriteFile(tavo::kCommitMarker, "stage /a\n", 0600);
+    EXPECT_EQ(tavo::ReadMarker(read), 0);
+    EXPECT_TRUE(read.IsEmpty());
+    EXPECT_FALSE(tavo::MarkerStands()) << "it decides nothing";
+    EXPECT_EQ(tavo::FileIdentity("/etc"), "-");
+    EXPECT_EQ(tavo::FileIdentity("/none"), "-");
+    EXPECT_TRUE(tavo::FileIdentity("/etc/passwd").find(":" + std::to_string(test::ReadFile("/etc/passwd").size())) !=
+                std::string::npos);
 }
 
 // What one of Samba's programs wrote into a file that had just been replaced.

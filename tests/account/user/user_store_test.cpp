@@ -261,6 +261,29 @@ TEST(UserStore, EditsWhileTheStoresAreBuilt)
     EXPECT_TRUE(GetUser("ext3"));
 }
 
+// Of root's with the mode that they are made with. Others may belong to somebody.
+TEST(UserStore, FoldersOfDeadBuildersAreRemoved)
+{
+    const struct {
+        const char *path;
+        mode_t mode;
+        bool is_left;
+    } rows[] = {{"/tmp/.db.user.tmp.dead", 0700, false},
+                {"/tmp/.db.user.tmp.open", 0755, true},
+                {"/tmp/.db.group.tmp.dead", 0700, true},
+                {"/tmp/db.user.tmp.dead", 0700, true}};
+    for (const auto &row : rows) {
+        ASSERT_EQ(::mkdir(row.path, row.mode), 0);
+        test::WriteFile(std::string(row.path) + "/store", "x");
+    }
+    ForgetStores();
+    ASSERT_TRUE(GetUser("root"));
+    for (const auto &row : rows) {
+        EXPECT_EQ(std::filesystem::exists(row.path), row.is_left) << row.path;
+        std::filesystem::remove_all(row.path);
+    }
+}
+
 // Another program edits the files during a change of ours, without the system's lock: accounts that our change does not
 // touch keep its edits.
 TEST(UserStore, EditsWhileOthersAreChanged)

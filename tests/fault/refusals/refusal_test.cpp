@@ -122,6 +122,7 @@ TEST_F(Refusals, Core)
     Refuses("file_set_keys", TLIBFileSetKeys, "/none", hash_, {MayBeNull(), nullptr});
     Refuses("file_set_line", TLIBFileSetLine, "/none", {1, 0, -1}, "x");
     Refuses("file_set_line_by_key", TLIBFileSetLineByKey, "/none", "key", "x");
+    Refuses("file_is_section", TLIBIFileIsSection, "[part]", 6);
     Refuses("file_touch", TLIBFileTouch, "/none/file");
     Refuses("file_utf8bom_strip", TLIBFileUTF8BomStrip, "/none");
     Refuses("proc_signal_by_pid_file", TLIBProcAliveByPidFile, "/none");
@@ -238,17 +239,17 @@ TEST_F(Refusals, Storage)
 // These log a bad argument without a code.
 TEST_F(Refusals, StorageWithoutACode)
 {
-    TLIBSZLIST *names = PslTLIBSzListAlloc(64), *none = PslTLIBSzListAlloc(64);
-    TLIBSzListPush(&list_, "/dev/sda3");
+    TLIBSZLIST *paths = PslTLIBSzListAlloc(64), *names = PslTLIBSzListAlloc(64);
+    TLIBSzListPush(&paths, "/dev/sda3");
     TLIBSzListPush(&names, "sda3");
-    const TLIBSZLIST *const devices = list_, *const bad = names, *const empty = none;
+    const TLIBSZLIST *const devices = paths, *const bad = names, *const empty = list_;
     LVMPVLIST *volumes = nullptr;
     LVMPV volume;
     LVMVG group = {}, unnamed = {};
     std::strcpy(group.szUuid, "x");
     LVMVGINFO info = {}, *found = nullptr;
     const LVMVGINFO no_devices = {};
-    info.pslPvs = list_;
+    info.pslPvs = paths;
     const LVMVGKEY key = {};
     const PARTITIONFILTER filter = {};
     const auto logs = [](const char *module) {
@@ -283,7 +284,7 @@ TEST_F(Refusals, StorageWithoutACode)
     Refuses(logs("partition_create"), PartitionCreate, {"/dev/sda", "sda"}, 0, {MayBeNull(), nullptr});
     Refuses(logs("partition_add_table"), PartitionAddTable, {"/dev/sda", "sda"});
     TLIBSzListFree(names);
-    TLIBSzListFree(none);
+    TLIBSzListFree(paths);
 }
 
 TEST_F(Refusals, Accounts)
@@ -296,9 +297,21 @@ TEST_F(Refusals, Accounts)
     static void *data = nullptr;
     static TAVOQUOTA quota;
     static const float limit = 1, below = -1;
+    static TAVOUSERDB users_open = {}, users_closed = {};
+    users_open.pUid = &store;
+    static TAVOGROUPDB groups_open = {&store, &store, &store}, groups_closed = {};
+    static char name[] = "none";
+    static TAVOGROUP record = {};
+    record.szName = name;
 
     Refuses("bdb_close", TAVOBDbClose, {MayBeNull(), nullptr, nullptr});
     Refuses("bdb_conf_sync_time_get", TAVOBDbConfSyncTimeGet, &store, &number32);
+    Refuses("bdb_conf_sync_time_set", TAVOBDbConfSyncTimeSet, &store, 0);
+    Refuses("bdb_deprecated_set", TAVOBDbDeprecatedSet, &store, 0);
+    Refuses("bdb_domain_expire_time_set", TAVOBDbDomainExpireTimeSet, &store);
+    Refuses("bdb_is_need_to_rebuild", TAVOBDbIsNeedToRebuild, &store, 0);
+    Refuses("user_db_get_free_uid", TAVOUserDBGetFreeUid, {&users_open, &users_closed});
+    Refuses("group_db_set", TAVOGroupDBSet, {&groups_open, &groups_closed}, {MayBeNull(), nullptr}, &record);
     Refuses("bdb_cursor_get", TAVOBDbCursorGet, &store, 0, &data, &number, &data, &number);
     Refuses("bdb_cursor_set_type", TAVOBDbCursorSetType, &store, {TAVO_BDB_CURSOR_KEY, -1, 100});
     Refuses("bdb_delete", TAVOBDbDelete, &store, "key", {3, 0});
@@ -385,9 +398,12 @@ TEST_F(Refusals, Network)
 TEST_F(Refusals, Services)
 {
     static TAVOEBOX *box = nullptr;
+    static const TAVOEBOX unit = {};
     static TAVOSERVICESHARE share;
 
     Refuses("ebox_info_enum", TAVOEBoxInfoEnum, &box);
+    Refuses("ebox_is_poweron", TAVOEBoxIsPoweron, &unit);
+    Refuses("net_bkp_service", TAVONetBkpService, {TAVO_DAEMON_STOP, -1, 100});
     Refuses("push_duser_used", TAVOPushDUserUsed, {&list_, &no_list});
     Refuses("user_modify_smb_conf", TAVOUserModifySmbConf, hash_);
     Refuses("service_action_set", TAVOServiceActionSet, {0, -1, 31}, TAVO_SERVICE_START);
@@ -419,13 +435,28 @@ TEST_F(Refusals, Services)
     Refuses("service_volume_getby_share", TAVOServiceVolumeGetbyShare, {"web", ""}, text, {64, 0});
 }
 
-// Names that no account or host can have, and buffers that are too small, have codes of their own.
-TEST_F(Refusals, NamesAndBuffers)
+// Names that no account or host can have, buffers that are too small, and files and devices that are something else.
+TEST_F(Refusals, NamesBuffersAndFiles)
 {
     static TAVOUSER *user = nullptr;
     static TAVOGROUP *group = nullptr;
-    const auto fails = [](int code, const char *module, int result) {
-        EXPECT_EQ(result, -1) << module;
+    const test::ScratchDir dir;
+    const std::string file = dir / "file";
+    test::WriteFile(file, std::to_string(::getpid()) + "\n");
+    const int null_device = ::open("/dev/null", O_RDONLY | O_CLOEXEC);
+    RAIDINFO array = {};
+    std::strcpy(array.szPath, "/dev/md77");
+    RAIDPROGRESS progress;
+    TAVOBDB store = {};
+    TAVOGROUPDB groups = {&store, &store, &store};
+    char name[] = "DOM\\none";
+    TAVOGROUP record = {};
+    record.szName = name;
+    TAVONETCARD card = {};
+    card.nMode = TAVO_NET_STATIC;
+    std::strcpy(card.szInterface, "eth0");
+    const auto fails = [](int code, const char *module, auto result) {
+        EXPECT_TRUE(result == 0 || result == static_cast<decltype(result)>(-1)) << module;
         EXPECT_EQ(test::LastFault(), (test::Fault{code, module}));
         test::ForgetFault();
     };
@@ -434,9 +465,29 @@ TEST_F(Refusals, NamesAndBuffers)
     fails(ERR_INVALID_GROUPNAME, "group_get", TAVOGroupGet("\xff", &group));
     fails(ERR_INVALID_GROUPNAME, "group_desc_get", TAVOGroupDescGet("\xff", text, sizeof text));
     fails(ERR_INVALID_GROUPNAME, "group_desc_set", TAVOGroupDescSet("\xff", "x"));
+    fails(ERR_INVALID_GROUPNAME, "group_db_set", TAVOGroupDBSet(&groups, nullptr, &record));
     fails(ERR_INVALID_NETNAME, "lnx_set_hostname", TAVOLnxSetHostname("a b"));
     fails(ERR_INVALID_NETNAME, "net_default_gateway_set", TAVONetDefaultGatewaySet("10.0.0"));
+    fails(ERR_INVALID_NETNAME, "net_set_card1", TAVONetSetCard1(&card, nullptr));
     fails(ERR_NOT_ENOUGH_MEMORY, "service_share_gen", TAVOServiceShareGen(1, "/volume1", text, 12));
+    fails(ERR_NOT_ENOUGH_MEMORY, "conf_get_mtu_value", TAVOConfGetMTUValue("none0", text, 2));
+    fails(ERR_FILE_NOT_FOUND, "sys_remove", TLIBSysRemove((dir / "none").c_str()));
+    fails(ERR_SYS_UNKNOWN, "sys_remove", TLIBSysRemove(dir.Path().c_str()));
+    fails(ERR_OPEN_FAILED, "proc_signal_by_pid_file", TLIBProcSignalByPidFile((dir / "none").c_str(), 0));
+    fails(ERR_SYS_UNKNOWN, "proc_signal_by_pid_file", TLIBProcSignalByPidFile(file.c_str(), 999));
+    fails(ERR_OPEN_FAILED, "file_read_lines", TLIBFileReadLines(dir.Path().c_str(), &list_));
+    fails(ERR_OPEN_FAILED, "file_enum_section", TLIBFileEnumSection(dir.Path().c_str(), &list_));
+    fails(ERR_OPEN_FAILED, "net_ipv6_is_enabled", BlTAVONetIPv6IsEnabled("none0"));
+    fails(ERR_OP_FAILURE, "net_bkp_service", TAVONetBkpService(TAVO_DAEMON_RELOAD));
+    fails(ERR_DISK_IO_FAILED, "disk_usb_get_info", TAVODiskUSBGetInfo("none", &number64));
+    fails(ERR_SYS_UNKNOWN, "raid_add_robust_check", RAIDAddRobustCheck(&array, "/dev/sdz3"));
+    fails(ERR_OPEN_FAILED, "raid_md_stripe_size_get", RAIDMdStripeSizeGet("/dev/md77"));
+    fails(ERR_UNKNOWN, "raid_ioctl_status", RAIDIoctlStatus(null_device, &number));
+    fails(ERR_UNKNOWN, "raid_rebuild_status_get", RAIDRebuildStatusGet(null_device, &progress));
+    fails(ERR_STAT_FAILED, "disk_get_devname_from_fd", TAVODiskGetDevnameFromFd(-1) ? 1 : 0);
+    fails(ERR_NOT_A_DISK, "disk_get_devname_from_fd", TAVODiskGetDevnameFromFd(null_device) ? 1 : 0);
+    fails(ERR_SYS_UNKNOWN, "quota_fmt_get", TAVOQuotaFmtGet("/dev/null"));
+    ::close(null_device);
 }
 
 }  // namespace

@@ -83,12 +83,16 @@ class Bond : public Cards {
         return test::Lines(calls);
     }
 
+    static constexpr const char *kUndo = "/var/undo";
     static constexpr const char *kCalls = "/var/standin/rc.log";
-    test::Story story_{TEST_GOLDEN, {NetworkCalls, test::LogOf(log_)}, {kScripts}};
+    test::Story story_{TEST_GOLDEN, {NetworkCalls, test::LogOf(log_)}, {kScripts, kUndo}};
 };
 
 TEST_F(Bond, IsMadeChangedAndDissolved)
 {
+    // What the next change would undo, as it is while the network is started.
+    WriteFile("/var/standin/rc.network.hook", "#!/bin/sh\ncp /etc/network.undo /var/undo\n", 0755);
+    story_.Mask("(command|boot) .*", "$1 ...");
     WriteFile(kScripts + "ifcfg-eth0.saved", "DEVICE=eth0\nIPADDR=10.");  // the remainder of an old copy
     TELL(Set(TAVO_NET_AGGR_ADAPTIVE, {"eth0", "eth1"}));
     // As the kernel and the files have it: nothing to do, and no error either.
@@ -218,6 +222,9 @@ TEST_F(Bond, MembersAreAddedOnceAndOnlyCards)
         TELL(TAVONetLinkAggrOptSlsaveAdd(&record, name));
         story_.Show("members", record.nMember);
     }
+    record.nMember = TAVO_NET_MEMBERS;
+    std::strcpy(record.rgszMember[1], "eth2");
+    TELL(TAVONetLinkAggrOptSlsaveAdd(&record, "eth1"));
     record.nMember = 1000000;
     TELL(TAVONetLinkAggrOptSlsaveAdd(&record, "eth1"));
 }

@@ -57,6 +57,7 @@ class NetIPv6 : public Cards {
         AddCard("eth0", "192.0.2.10");
         WriteFile(kIfcfg, "DEVICE=eth0\nBOOTPROTO=dhcp\n");
         WriteFile(kTavoinfo, "support_wol=\"yes\"\nwol_enabled_options=\"g\"\n");
+        story_.Mask("(boot|owner) .*", "$1 ...");            // of a checkpoint
         story_.Mask("dhcpcd error .*", "dhcpcd error ...");  // of an earlier call
         calls_.OnIoctl([this](int, unsigned long request, void *argument) {
             return request == SIOCETHTOOL ? wake_.Answer(static_cast<ifreq *>(argument)) : Answer(request, argument);
@@ -68,7 +69,7 @@ class NetIPv6 : public Cards {
     Wake wake_;
     test::Story story_{TEST_GOLDEN,
                        {test::CommandsOf(commands_), test::LogOf(log_), test::CallsOf(calls_, "sleep"), WakeCalls()},
-                       {kIfcfg, kTavoinfo}};
+                       {kIfcfg, kTavoinfo, "/etc/network.checkpoint"}};
 
   private:
     // The orders that the card got.
@@ -135,6 +136,8 @@ TEST_F(NetIPv6, AddressesComeFromTheKernelsTable)
     TELL(enumerate());
     story_.Show("addresses", test::Items(list.get()));
     tree_.Remove("/proc/net/if_inet6");
+    TELL(enumerate());
+    tree_.Put("/proc/net/if_inet6/unreadable", "");
     TELL(enumerate());
 }
 

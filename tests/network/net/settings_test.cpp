@@ -52,6 +52,7 @@ class NetSettings : public Cards {
         WriteFile("/etc/tavoinfo.conf", "");
         WriteFile(kIfcfg,
                   "# mine\nDEVICE=eth0\nONBOOT=yes\nBOOTPROTO=static\nIPADDR=192.0.2.10\nNETMASK=255.255.255.0\n");
+        story_.Mask("(command|boot|owner) .*", "$1 ...");  // of the record of a change, or a checkpoint
         story_.Mask("(strerror=| error |format, errno=)[A-Z\\[][^)]*", "$1...");  // of an earlier call
     }
 
@@ -66,7 +67,8 @@ class NetSettings : public Cards {
     test::Story story_{TEST_GOLDEN,
                        {test::CommandsOf(commands_), test::LogOf(log_), test::CallsOf(calls_, "sleep")},
                        {test::kScripts, "/etc/sysconfig/network", "/etc/hosts", "/etc/resolv.conf", "/var/ns/resolv",
-                        "/etc/tavoinfo.conf", "/etc/dhcpc", "/etc/resolv.conf.bak", "/etc/ppp/old_gateway.bak"}};
+                        "/etc/tavoinfo.conf", "/etc/dhcpc", "/etc/resolv.conf.bak", "/etc/ppp/old_gateway.bak",
+                        "/etc/network.checkpoint"}};
 };
 
 TEST_F(NetSettings, AStaticAddressIsAppliedAndStored)
@@ -185,6 +187,9 @@ TEST_F(NetSettings, TheCardIsReadFromItsFileAndTheKernel)
     EXPECT_EQ(card.nMode, TAVO_NET_DHCP);
     tree_.Put("/sys/class/net/eth1/type/unreadable", "");
     TELL(TAVONetGetCard1(&card));  // it may be the first one
+    tree_.Remove("/proc/net/route");
+    char gateway[16];
+    TELL(TAVONetDefaultGatewayGet(gateway, sizeof gateway));
     tree_.Remove("/sys/class/net");
     TELL(TAVONetGetCard1(&card));
 }
@@ -289,26 +294,106 @@ TEST_F(NetSettings, ANameThatTheKernelRefusesIsNotStored)
     refuses_name = false;
 }
 
-// A checkpoint without one of the parts could not restore it.
-TEST_F(NetSettings, ACheckpointHasEveryPartOrIsNotTaken)
+// A folder has the place of one file. What needs the file fails and puts back what it has done; the rest works.
+TEST_F(NetSettings, ReportsFilesThatCannotBeReadOrWritten)
 {
-    WriteFile("/etc/hosts", "");
-    WriteFile("/etc/resolv.conf", "");
     const std::filesystem::path kept = "/etc/kept";
-    for (const std::string path : {"/etc/sysconfig/network", "/etc/resolv.conf", "/etc/hosts", kIfcfg.c_str(),
-                                   "/etc/sysconfig/network-scripts"}) {
-        const bool is_folder = std::filesystem::is_directory(path);
+    const List servers = MakeList({"192.0.2.53"});
+    List found = MakeList({});
+    for (const std::string path : {kIfcfg.c_str(), "/etc/sysconfig/network", "/etc/resolv.conf", "/etc/hosts"}) {
+        for (const char *text : {"/etc/resolv.conf", "/etc/hosts"})
+            WriteFile(text, "");
         std::filesystem::rename(path, kept);
-        if (is_folder)
-            WriteFile(path, "");
-        else
-            std::filesystem::create_directory(path);
-        EXPECT_EQ(TAVONetCheckpointTake(), -1) << path;
-        EXPECT_EQ(LastFault(), (test::Fault{ERR_READ_FAILED, "net_checkpoint_take"})) << path;
-        EXPECT_FALSE(std::filesystem::exists("/etc/network.checkpoint")) << path;
-        std::filesystem::remove(path);
+        std::filesystem::create_directory(path);
+        story_.Head(path);
+        TELL(TAVONetCheckpointTake());
+        TELL(SetCard(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0"));
+        TELL(TAVONetIPv6Set("eth0", 1));
+        TELL(BlTAVOLnxIsDHCP("eth0"));
+        TELL(TAVONetDefaultGatewaySet("192.0.2.254"));
+        TELL(TAVOLnxSetHostname("attic"));
+        TELL(TAVONetDNSSet(servers.get()));
+        TELL(test::Moving(found, TAVONetDNSGet));
+        EXPECT_FALSE(std::filesystem::exists("/etc/network.checkpoint"));
+        std::filesystem::remove_all(path);
         std::filesystem::rename(kept, path);
     }
+}
+
+// The record that the next change would undo, as it is while the last command runs.
+TEST_F(NetSettings, AChangeRecordsWhatItMayTouch)
+{
+    commands_.OnCommand([](const std::string &) {
+        std::error_code none;
+        std::filesystem::copy_file("/etc/network.undo", "/etc/dhcpc/undo",
+                                   std::filesystem::copy_options::overwrite_existing, none);
+        return test::CommandReply{};
+    });
+    WriteFile("/etc/hosts", "127.0.0.1\tlocalhost\n192.0.2.10\ttavo\n");
+    WriteFile("/etc/resolv.conf", "nameserver 192.0.2.53\n");
+    WriteFile("/etc/tavoinfo.conf", "eth0_mtu=9000\n");
+    WriteFile(kLease, "IPADDR=192.0.2.77\nNETMASK=255.255.255.0\n");
+    TELL(SetCard(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0"));
+    TELL(SetCard(TAVO_NET_DHCP));
+    TELL(TAVONetDefaultGatewaySet("192.0.2.254"));
+    TELL(TAVONetSetMTUValue("eth0", 1400));
+    TELL(TAVONetRouteAdd("10.20.0.0", "255.255.0.0", "eth0"));
+    TELL(TAVONetRouteDel("10.20.0.0", "255.255.0.0", "eth0"));
+    TELL(TAVONetIPv6Set("eth0", 0));
+    TELL(TAVONetIPv6AddrAdd("eth0", "2001:db8::7", 64));
+    TELL(TAVONetIPv6AddrDel("eth0", "2001:db8::7", 64));
+    TELL(TAVONetIPv6RouteAdd("eth0", "2001:db8:1::", 48, "fe80::1"));
+    TELL(TAVONetIPv6RouteDel("eth0", "2001:db8:1::", 48, nullptr));
+}
+
+TEST_F(NetSettings, ACheckpointHasTheWholeNetwork)
+{
+    AddCard("eth1");
+    tree_.Put("/sys/class/net/eth0/flags", "0x1003\n");
+    tree_.Put("/sys/class/net/eth0/iflink", "2\n");
+    tree_.Put("/sys/class/net/bond0/type", "1\n");
+    tree_.Put("/sys/class/net/bond0/bonding/mode", "802.3ad 4\n");
+    tree_.Put("/sys/class/net/bond0/bonding/slaves", "eth0 eth1\n");
+    tree_.Put("/sys/class/net/lo/type", "772\n");
+    tree_.Put("/proc/net/if_inet6", "20010db8000000000000000000000001 02 40 00 80     eth0\n");
+    WriteFile("/etc/hosts", "127.0.0.1\tlocalhost\n192.0.2.10\ttavo\n");
+    WriteFile("/etc/resolv.conf", "nameserver 192.0.2.53\n");
+    WriteFile("/etc/tavoinfo.conf", "eth0_mtu=9000\nrunsamba=yes\neth0_wol_options=g\n");
+    WriteFile(test::kScripts + "more-eth0", "192.0.2.11\n");
+    WriteFile(test::kScripts + "rules", "no part of it\n");
+    TELL(TAVONetCheckpointPutBack());
+    TELL(TAVONetCheckpointEnd());
+    TELL(TAVONetCheckpointTake());
+    TELL(TAVONetCheckpointTake());
+
+    const auto change = [&] {
+        std::filesystem::remove(kIfcfg);
+        WriteFile(test::kScripts + "ifcfg-eth1", "DEVICE=eth1\n");
+        WriteFile(test::kScripts + "more-eth0", "192.0.2.12\n");
+        WriteFile("/etc/tavoinfo.conf", "eth1_mtu=1400\nrunsamba=no\neth0_wol_options=d\n");
+        WriteFile("/etc/sysconfig/network", "GATEWAY=192.0.2.254\nHOSTNAME=attic\n");
+        tree_.Put("/sys/class/net/eth0/mtu", "1400\n");
+        SetRoutes(kConnected);
+    };
+    change();
+    TELL(TAVONetCheckpointPutBack());
+    // With other cards the network is stopped before its files change, and started.
+    ASSERT_EQ(TAVONetCheckpointTake(), 0);
+    change();
+    tree_.Put("/sys/class/net/bond0/bonding/slaves", "eth0\n");
+    TELL(TAVONetCheckpointPutBack());
+    // A program that died has left it.
+    ASSERT_EQ(TAVONetCheckpointTake(), 0);
+    std::string record = ReadFile("/etc/network.checkpoint");
+    WriteFile("/etc/network.checkpoint", record.replace(6, record.find('\n') - 6, "1 1"));
+    change();
+    TELL(TAVONetHostsRefresh());
+    // Before the machine was started again.
+    ASSERT_EQ(TAVONetCheckpointTake(), 0);
+    record = ReadFile("/etc/network.checkpoint");
+    WriteFile("/etc/network.checkpoint", record.replace(record.find("\nboot ") + 6, 4, "past"));
+    change();
+    TELL(TAVONetHostsRefresh());
 }
 
 // What was started since the checkpoint ends, and the client of that time goes on.
