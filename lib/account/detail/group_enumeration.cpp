@@ -22,36 +22,22 @@ bool IsListed(const GroupLine &group, int flags)
            group.gid >= TAVO_GROUP_GID_MIN || group.name == "users";
 }
 
-}  // namespace
-
-Code ListGroups(int flags, const KeyFilter &wanted, std::vector<std::string> &names)
+Result<AccountNames> ListGroups(int flags, const KeyFilter &wanted)
 {
     if ((flags & (TAVO_GROUP_LOCAL | TAVO_GROUP_DOMAIN)) == 0)
         return ERR_BAD_PARAMETERS;
     AccountSession session(kGroupKind);
     if (const Code code = session.OpenToRead(std::array{size_t{kGroupNameStore}}))
         return code;
-    StoreView &groups = *session.View(kGroupNameStore);
-    std::string_view key;
-    std::string_view value;
-    Code code;
-    for (Entry which = Entry::first; (code = groups.Walk(which, key, value)) == 0; which = Entry::next) {
-        const Result<GroupLine> group = ParseGroupLine(value);
-        if (!group)
-            continue;
-        const int kind = IsDomainName(group->name) ? TAVO_GROUP_DOMAIN : TAVO_GROUP_LOCAL;
-        if ((flags & kind) != 0 && IsListed(*group, flags) && wanted(key.substr(0, key.find('\0'))))
-            names.push_back(group->name);
-    }
-    return code == ERR_DB_END ? Code() : code == ERR_OUT_OF_MEMORY ? code : Code(ERR_ENUM_FAILED);
+    return NamesIn(*session.View(kGroupNameStore), wanted, [&](std::string_view line) -> std::optional<std::string> {
+        const Result<GroupLine> group = ParseGroupLine(line);
+        const int kind = group && IsDomainName(group->name) ? TAVO_GROUP_DOMAIN : TAVO_GROUP_LOCAL;
+        return group && (flags & kind) != 0 && IsListed(*group, flags) ? std::optional(group->name) : std::nullopt;
+    });
 }
 
-std::optional<std::string> GroupFilterText(const char *text)
-{
-    std::optional<std::string> key = AccountKey(text, kGroupKeySize);
-    if (key)
-        key->pop_back();
-    return key;
-}
+}  // namespace
+
+constexpr NameSource kGroupNames{kGroupKeySize, ListGroups};
 
 }  // namespace tavo

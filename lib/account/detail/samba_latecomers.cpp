@@ -20,19 +20,19 @@ namespace {
 constexpr int kTries = 1000;
 constexpr timespec kPause{0, 1000000};
 
-struct Line {
+struct SmbLine {
     std::string_view name;
     std::string_view uid;
     std::string_view rest;  // from the hashes on
     std::string_view whole;
 };
 
-std::vector<Line> LinesOf(std::string_view text)
+std::vector<SmbLine> LinesOf(std::string_view text)
 {
-    std::vector<Line> lines;
+    std::vector<SmbLine> lines;
     while (!text.empty()) {
         const size_t end = text.find('\n');
-        Line line;
+        SmbLine line;
         line.whole = text.substr(0, end);
         text.remove_prefix(end == text.npos ? text.size() : end + 1);
         const size_t name_end = line.whole.find(':');
@@ -95,16 +95,16 @@ void Rewrite(int fd, std::string_view text)
 std::string WithLateLines(std::string_view text, std::string_view before, std::string_view after)
 {
     std::map<std::string_view, std::string_view> old;
-    for (const Line &line : LinesOf(before))
+    for (const SmbLine &line : LinesOf(before))
         old.emplace(line.name, line.rest);
-    std::vector<Line> lines = LinesOf(text);
+    std::vector<SmbLine> lines = LinesOf(text);
     const auto find = [&](std::string_view name, std::string_view uid) {
-        return std::find_if(lines.begin(), lines.end(), [&](const Line &line) {
+        return std::find_if(lines.begin(), lines.end(), [&](const SmbLine &line) {
             return !line.name.empty() && line.uid == uid && (name.empty() || line.name == name);
         });
     };
     std::string added;
-    for (const Line &late : LinesOf(after)) {
+    for (const SmbLine &late : LinesOf(after)) {
         const auto was = old.find(late.name);
         if (late.name.empty() || (was != old.end() && was->second == late.rest))
             continue;
@@ -117,7 +117,7 @@ std::string WithLateLines(std::string_view text, std::string_view before, std::s
             added.append(late.whole) += '\n';
     }
     std::string result;
-    for (const Line &line : lines) {
+    for (const SmbLine &line : lines) {
         if (line.name.empty())
             result.append(line.whole) += '\n';
         else

@@ -43,20 +43,11 @@ Code AddDomainUsersInUse(const KeyFilter &wanted, std::vector<std::string> &name
     return 0;
 }
 
-}  // namespace
-
-bool PushNames(TLIBSZLIST **list, const std::vector<std::string> &names)
-{
-    for (const std::string &name : names)
-        if (TLIBSzListPush(list, name.c_str()) < 0)
-            return false;
-    return true;
-}
-
-Code ListUsers(int flags, const KeyFilter &wanted, std::vector<std::string> &names)
+Result<AccountNames> ListUsers(int flags, const KeyFilter &wanted)
 {
     if ((flags & kAllFlags) == 0)
         return ERR_BAD_PARAMETERS;
+    AccountNames names;
     if ((flags & TAVO_USER_DOMAIN_USED) != 0)
         if (const Code code = AddDomainUsersInUse(wanted, names))
             return code;
@@ -66,19 +57,20 @@ Code ListUsers(int flags, const KeyFilter &wanted, std::vector<std::string> &nam
     const std::optional<bool> guest_is_supported = ReadSetting(kFactorySettings, "supportguest", "yes");
     if (!guest_is_supported)
         return ERR_ENUM_FAILED;
-    StoreView &accounts = *session.View(kNameStore);
-    std::string_view key;
-    std::string_view value;
-    Code code;
-    for (Entry which = Entry::first; (code = accounts.Walk(which, key, value)) == 0; which = Entry::next) {
-        const Result<PasswdLine> account = ParsePasswdLine(value);
-        if (!account)
-            continue;
-        const int kind = IsDomainName(account->name) ? TAVO_USER_DOMAIN : TAVO_USER_LOCAL;
-        if ((flags & kind) != 0 && IsListed(*account, *guest_is_supported) && wanted(key.substr(0, key.find('\0'))))
-            names.push_back(account->name);
-    }
-    return code == ERR_DB_END ? Code() : code == ERR_OUT_OF_MEMORY ? code : Code(ERR_ENUM_FAILED);
+    const auto name_of = [&](std::string_view line) -> std::optional<std::string> {
+        const Result<PasswdLine> account = ParsePasswdLine(line);
+        const int kind = account && IsDomainName(account->name) ? TAVO_USER_DOMAIN : TAVO_USER_LOCAL;
+        return account && (flags & kind) != 0 && IsListed(*account, *guest_is_supported) ? std::optional(account->name)
+                                                                                         : std::nullopt;
+    };
+    Result<AccountNames> stored = NamesIn(*session.View(kNameStore), wanted, name_of);
+    if (stored)
+        stored->insert(stored->begin(), names.begin(), names.end());
+    return stored;
 }
+
+}  // namespace
+
+constexpr NameSource kUserNames{kUserKeySize, ListUsers};
 
 }  // namespace tavo

@@ -2,10 +2,10 @@
 #include "tavo_group.h"
 #include "tavo_user.h"
 
+#include "account/detail/account_listing.h"
 #include "account/detail/account_name.h"
 #include "account/detail/group_line.h"
 #include "account/detail/group_owner.h"
-#include "account/detail/user_enumeration.h"
 #include "core/detail/guard.h"
 #include "core/detail/text_fields.h"
 
