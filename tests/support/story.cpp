@@ -11,8 +11,6 @@
 #include <filesystem>
 #include <iterator>
 
-#include <syslog.h>
-
 namespace test {
 namespace {
 
@@ -136,15 +134,17 @@ Story::Source CommandsOf(RecordedCommands &commands, const std::string &without)
     };
 }
 
-Story::Source LogOf(CapturedLog &log)
+Story::Source LogOf(CapturedLog &log, int least)
 {
-    return [&log] {
-        std::vector<std::string> lines;
-        for (const LoggedLine &line : log.Lines())
-            lines.push_back(line.priority == LOG_ERR ? "log " : "log at " + std::to_string(line.priority) + " ");
+    return [&log, least] {
+        const std::vector<LoggedLine> kept = log.Lines();
         const std::vector<std::string> texts = log.TakeTexts();
-        for (size_t i = 0; i < texts.size(); ++i)
-            lines[i] += texts[i];
+        std::vector<std::string> lines;
+        for (size_t i = 0; i < kept.size(); ++i) {
+            const int priority = kept[i].priority;
+            if (priority <= least)
+                lines.push_back((priority == LOG_ERR ? "log " : "log at " + std::to_string(priority) + " ") + texts[i]);
+        }
         return lines;
     };
 }

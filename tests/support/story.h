@@ -20,6 +20,8 @@
 #include <utility>
 #include <vector>
 
+#include <syslog.h>
+
 namespace test {
 
 class Story {
@@ -76,7 +78,8 @@ class Story {
 
 // Without the commands that match the pattern.
 Story::Source CommandsOf(RecordedCommands &commands, const std::string &without = "");
-Story::Source LogOf(CapturedLog &log);
+// Without the lines below that priority.
+Story::Source LogOf(CapturedLog &log, int least = LOG_DEBUG);
 // Those of the calls that begin so.
 Story::Source CallsOf(RecordedCalls &calls, const std::string &begin = "");
 
