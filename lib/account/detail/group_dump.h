@@ -22,7 +22,7 @@ struct GroupDumpReport {
 };
 
 // Adds the files to a commit. 0, ERR_OPEN_FAILED, ERR_WRITE_FAILED, ERR_NOT_ENOUGH_SPACE, ERR_FORMAT_ERROR (a store holds a
-// line that is no group), or a code of the stores.
+// line that is not a group), or a code of the stores.
 Code ComposeGroups(const TAVOGROUPDB &db, AccountCommit &commit, unsigned target, GroupDumpReport &report);
 
 // Logs the lines that are not written again because they are not groups.

@@ -27,7 +27,7 @@ struct DumpReport {
 };
 
 // Adds the files to a commit. 0, ERR_OPEN_FAILED, ERR_WRITE_FAILED, ERR_NOT_ENOUGH_SPACE, ERR_FORMAT_ERROR (a store holds a
-// line that is no account), or a code of the stores.
+// line that is not an account), or a code of the stores.
 Code ComposeUsers(const TAVOUSERDB &db, AccountCommit &commit, DumpReport &report);
 
 // Composes the files and commits everything: the end of every change of users. A failure is logged and reported under the

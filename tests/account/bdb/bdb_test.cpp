@@ -213,7 +213,7 @@ TEST(Bdb, RemovesForeignFiles)
         std::function<void()> plant;
         const char *name;
     } rows[] = {
-        {[&] { put("this is no store\n"); }, "garbage"},
+        {[&] { put("this is not a store\n"); }, "garbage"},
         {[&] { put(std::string(65536, '\0')); }, "zeros"},
         {[&] { put(whole.substr(0, 20000)); }, "cut"},
         {[&] { put(whole.substr(0, 100)); }, "only its head"},

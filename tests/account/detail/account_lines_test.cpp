@@ -173,7 +173,7 @@ TEST(UserTexts, ForeignFilesKeepTheirAccounts)
                                 .misc = "#$_@UID__INDEX@_$2000$\n# record user misc\nBOB:3:mail\n",
                                 .smb = "# samba\nbob:1031:X:Y:[U          ]:LCT-00000000:\n"});
     const auto &names = stores[tavo::kNameStore];
-    EXPECT_EQ(names.size(), 8u) << "an empty name and what has no seven fields is no account";
+    EXPECT_EQ(names.size(), 8u) << "a line with an empty name or without seven fields is not an account";
     EXPECT_EQ(Value(names, "ROOT"), "root:x:0:0:root:/root:/bin/sh\0"s);
     EXPECT_EQ(Value(names, "BOB"), "Bob:x:1030:100::/home/bob:/bin/sh\0"s);
     EXPECT_EQ(Value(names, "bob"), "bob:x:1031:100::/home/bob2:/bin/sh\0"s) << "same name in other case, other account";

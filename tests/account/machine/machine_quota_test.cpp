@@ -140,7 +140,7 @@ TEST_F(MachineQuota, LimitsAreSetEnforcedReportedAndClearedWithTheUser)
     const int berta = UserId("berta");
     ASSERT_EQ(test::DeleteUser("berta"), 0);
     ASSERT_EQ(::quotactl(QCMD(Q_GETQUOTA, USRQUOTA), device, berta, reinterpret_cast<caddr_t>(&block)), 0);
-    EXPECT_EQ(block.dqb_bhardlimit, 0u) << "whoever gets this id next starts without a limit";
+    EXPECT_EQ(block.dqb_bhardlimit, 0u) << "the next account with this id starts without a limit";
 
     EXPECT_EQ(FaultOf(TAVOQuotaSet("anna", "/dev/none", &limit)).code, ERR_FILE_NOT_FOUND);
 

@@ -261,7 +261,7 @@ TEST(UserStore, EditsWhileTheStoresAreBuilt)
     EXPECT_TRUE(GetUser("ext3"));
 }
 
-// Of root's with the mode that they are made with. Others may belong to somebody.
+// Of root's with the mode that they are made with. Others may belong to another user.
 TEST(UserStore, FoldersOfDeadBuildersAreRemoved)
 {
     const struct {

@@ -223,7 +223,7 @@ TEST(UserStorm, WorkersAndTheSystemsTools)
         const std::string name = Field(line, 0);
         const auto account = expected.find(name);
         ASSERT_NE(account, expected.end()) << name << " should not be there";
-        EXPECT_TRUE(found.insert(*account).second) << name << " stands there twice";
+        EXPECT_TRUE(found.insert(*account).second) << name << " is there twice";
         if (!name.starts_with('w'))
             continue;
         EXPECT_TRUE(owners.emplace(Field(line, 2), name).second) << "one user id for two: " << line;

@@ -174,7 +174,7 @@ TEST(UserSet, UidsOfTheRange)
     ASSERT_TRUE(GetUser("admin"));
     current(3072);
     EXPECT_EQ(AddUser({.name = "a"}), 0);
-    EXPECT_EQ(GetUser("a")->nUid, 1026) << "behind 3072 comes 1024; admin and guest have two of them";
+    EXPECT_EQ(GetUser("a")->nUid, 1026) << "after 3072 comes 1024; admin and guest have two of them";
     current(500);
     EXPECT_EQ(AddUser({.name = "b"}), 0);
     EXPECT_EQ(GetUser("b")->nUid, 1027);
@@ -195,7 +195,7 @@ TEST(UserSet, UidsOfTheRange)
 
     const auto before = AllFiles();
     ASSERT_EQ(::unlink("/tmp/.db.user.seal"), 0);
-    EXPECT_EQ(AddUser({.name = "full"}), ERR_TOO_MANY_USERS) << "also in stores that were built anew";
+    EXPECT_EQ(AddUser({.name = "full"}), ERR_TOO_MANY_USERS) << "also in stores that were rebuilt";
     EXPECT_EQ(AllFiles(), before);
 }
 

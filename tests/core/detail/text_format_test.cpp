@@ -18,7 +18,7 @@ TEST(FormatText, WritesLikePrintf)
     EXPECT_EQ(Logged("%X %u %lld %5d|%05d", {-1, -1, -5000000000LL, 42, -42}),
               "FFFFFFFF 4294967295 -5000000000    42|-0042");
     EXPECT_EQ(Logged("%c 100%% %d", {'x', "text"}), "x 100% text") << "the argument's type decides";
-    EXPECT_EQ(Logged("%s %s %q %", {nullptr}), "(null) %s %q %") << "what cannot be filled stands as it is";
+    EXPECT_EQ(Logged("%s %s %q %", {nullptr}), "(null) %s %q %") << "what cannot be filled stays as it is";
 }
 
 TEST(WriteLog, KeepsArgumentsInTheirLine)

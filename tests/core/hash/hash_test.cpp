@@ -95,7 +95,7 @@ TEST(HashLookDict, WritingPrefersARemovedPairAfterHome)
     EXPECT_EQ(TLIBISetLookDict(hash.get(), key(0).c_str()), 1);
     EXPECT_EQ(SetValue(hash, key(0), "0"), 1);
     EXPECT_EQ(TLIBISetLookDict(hash.get(), key(0).c_str()), 1);
-    EXPECT_EQ(TLIBISetLookDict(hash.get(), key(1).c_str()), -1) << "an unused slot behind home is not offered";
+    EXPECT_EQ(TLIBISetLookDict(hash.get(), key(1).c_str()), -1) << "an unused slot after home is not offered";
     EXPECT_EQ(SetValue(hash, key(1), "1"), 2);
     EXPECT_EQ(SetValue(hash, key(2), "2"), 3);
     EXPECT_EQ(TLIBIGetLookDict(hash.get(), key(2).c_str()), 3);
@@ -205,7 +205,7 @@ TEST(Hash, TinyTables)
     EXPECT_EQ(SzTLIBSzHashGetValue(none.get(), "k"), nullptr);
     Hash one(PshTLIBIHashAllocator(1, 100));
     EXPECT_EQ(SetValue(one, "k", "v"), 0);
-    EXPECT_EQ(SetValue(one, "l", "v"), -1) << "4 * 1 - 5 is no number of slots";
+    EXPECT_EQ(SetValue(one, "l", "v"), -1) << "4 * 1 - 5 is not a number of slots";
     EXPECT_EQ(Pairs(one.get()), (PairMap{{"k", "v"}}));
     Hash two(PshTLIBIHashAllocator(2, 0));
     for (const char *key : {"a", "b", "c", "d", "e", "f"})

@@ -71,7 +71,7 @@ class Ps : public testing::Test {
             const int descriptors = test::OpenDescriptors();
             body();
             EXPECT_EQ(test::OpenDescriptors(), descriptors);
-            EXPECT_FALSE(::access(scratch_.c_str(), F_OK) == 0) << "the scratch file stays behind";
+            EXPECT_FALSE(::access(scratch_.c_str(), F_OK) == 0) << "the scratch file is still there";
         }
     }
 
@@ -112,7 +112,7 @@ TEST_F(Ps, PatternsAreExpressionsForGrepAndTextWithoutIt)
 {
     EXPECT_EQ(TLIBPs("sl[e]ep 27.828$", nullptr, 0), 5);
     EXPECT_EQ(TLIBPs("^ *[0-9]* sleep 271828$", nullptr, 0), 5)
-        << "the search does not find itself, and that is no failure";
+        << "the search does not find itself, and that is not a failure";
     other_ps = "/bin/false";
     EXPECT_EQ(TLIBPs("sl[e]ep 27.828$", nullptr, 0), 0);
 }
@@ -128,7 +128,7 @@ TEST_F(Ps, HostilePatterns)
             EXPECT_NE(::access(canary.c_str(), F_OK), 0) << pattern;
         }
         std::vector<pid_t> found(10, 0);
-        EXPECT_EQ(TLIBPs("no such \\(", found.data(), 10), 0) << "a complaint of grep is no process";
+        EXPECT_EQ(TLIBPs("no such \\(", found.data(), 10), 0) << "a complaint of grep is not a process";
     });
     test::OwnChild dashed([] { ::execl("/bin/sh", "sh", "-c", "sleep 60; : -zq9", nullptr); });
     ::usleep(50000);
@@ -199,7 +199,7 @@ TEST_F(Ps, TrapsAtTheScratchFile)
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
     EXPECT_EQ(test::ReadFile(victim), "kept");
     for (const auto &entry : std::filesystem::directory_iterator("/tmp"))
-        EXPECT_FALSE(entry.path().string().starts_with(scratch_)) << entry.path() << " stays behind";
+        EXPECT_FALSE(entry.path().string().starts_with(scratch_)) << entry.path() << " is still there";
 }
 
 }  // namespace

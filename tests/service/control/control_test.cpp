@@ -478,7 +478,7 @@ TEST_F(Services, OnlyALinkIsReplaced)
     ASSERT_EQ(::mkdir("/volume1/elsewhere", 0755), 0);
     ASSERT_EQ(::symlink("/volume1/elsewhere", "/volume1/photo"), 0);
     EXPECT_EQ(FaultOf(TAVOServiceShareCreate(2, "/volume1")), (Fault{ERR_MKDIR_FAILED, "service_share_create"}))
-        << "somebody's link is no data folder";
+        << "a link of another user is not a data folder";
 
     ASSERT_EQ(TAVOServiceSet(5, "/volume1"), 0);
     ASSERT_EQ(::symlink("/volume1/elsewhere", "/volume1/video/link"), 0);

@@ -119,7 +119,7 @@ TEST(DrivePage, KnowsDrivesWithoutRotatingMedium)
     } rows[] = {
         {0x00FE, 1, 0x4000, 1, 1, true, "ATA-7, non-rotating"},
         {0x007E, 1, 0x4000, 1, 1, false, "ATA-6 does not know the word"},
-        {0x8080, 1, 0x4000, 1, 1, true, "bit 15 is no version"},
+        {0x8080, 1, 0x4000, 1, 1, true, "bit 15 is not a version"},
         {0x8001, 1, 0x4000, 1, 1, false, "neither is bit 0"},
         {0x0000, 1, 0x4000, 1, 1, false, "no version at all"},
         {0xFFFF, 1, 0x4000, 1, 1, false, "no version at all"},

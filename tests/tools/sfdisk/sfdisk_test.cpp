@@ -170,7 +170,7 @@ TEST_F(Sfdisk, RefusesWhatDoesNotFit)
         EXPECT_EQ(result.status, 1) << row.complaint;
         EXPECT_THAT(result.err, testing::HasSubstr(row.complaint));
         EXPECT_EQ(Sector(0) + Sector(1) + Sector(2), before) << row.line;
-        EXPECT_EQ(Run("-N4 -o108 -z10 -t83").status, 0) << "right behind it";
+        EXPECT_EQ(Run("-N4 -o108 -z10 -t83").status, 0) << "right after it";
     }
 
     Resize(0);

@@ -22,7 +22,7 @@ On a machine without \fI/etc.defaults/tavoinfo.conf\fR they refuse, unless \fB\-
 A failure is one line on standard error: what was attempted, why it failed, and a hint;
 \fB\-\-verbose\fR adds where in the library it arose.
 Control characters in values are shown as \fB\\xNN\fR.
-An argument that begins with a dash stands behind \fB\-\-\fR.
+An argument that begins with a dash goes after \fB\-\-\fR.
 )";
 
 constexpr std::string_view tail = R"(.SH EXIT STATUS
