@@ -74,7 +74,7 @@ bool AccountTransaction::IsPending(bool is_group, const std::string &key) const
            }));
 }
 
-Code AccountTransaction::ComposeAccounts(const std::function<int()> &compose)
+Code AccountTransaction::ComposeAccounts(const std::function<Code()> &compose)
 {
     constexpr int rounds = 5;
     for (int round = 0; round < rounds; ++round) {

@@ -43,7 +43,7 @@ class AccountTransaction {
 
     // Composes the account files by `compose` from stores into which everything is merged that others have changed in
     // the files meanwhile. Its code; after some rounds ERR_RENAME_FAILED.
-    Code ComposeAccounts(const std::function<int()> &compose);
+    Code ComposeAccounts(const std::function<Code()> &compose);
 
     // Everything at once, then the home folders. A code of AccountCommit::Commit. From 0 on nothing fails any more.
     Code Commit();

@@ -7,6 +7,7 @@
 #include "account/detail/account_commit.h"
 #include "account/detail/indexed_accounts.h"
 #include "core/detail/result.h"
+#include "core/detail/where.h"
 
 #include <string>
 #include <vector>
@@ -33,6 +34,10 @@ Code ComposeUsers(const TAVOUSERDB &db, AccountCommit &commit, DumpReport &repor
 // Composes the files and commits everything: the end of every change of users. A failure is logged and reported under the
 // name of TAVOUserDBDump, which log watchers know: -1.
 int CommitUsers(AccountTransaction &change);
+
+// The tail of a function that changes users: commits, or closes the stores as they were when nothing changed, releases
+// the locks, and notifies. 0, or -1 with ERR_UNLOCK_FAILED at `where` or what CommitUsers reported.
+int FinishUsers(AccountTransaction &change, bool changed, Where where = Where());
 
 }  // namespace tavo
 

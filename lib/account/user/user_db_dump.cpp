@@ -1,4 +1,5 @@
 // Writes the four account files from the open stores.
+#include "tavo_appliance.h"
 #include "tavo_user.h"
 
 #include "account/detail/account_transaction.h"
@@ -6,6 +7,7 @@
 #include "account/detail/family_dump.h"
 #include "account/detail/name_caches.h"
 #include "account/detail/user_accounts.h"
+#include "account/detail/user_batch.h"
 #include "account/detail/user_dump.h"
 #include "core/detail/guard.h"
 #include "core/detail/log.h"
@@ -69,6 +71,17 @@ int tavo::CommitUsers(AccountTransaction &change)
         return FailUserDump(code, report);
     LogDropped(report);
     return 0;
+}
+
+int tavo::FinishUsers(AccountTransaction &change, bool changed, Where where)
+{
+    if (changed && CommitUsers(change) != 0)
+        return -1;
+    if (!changed && change.Session().Seal(AccountSession::Texts::as_before) != 0)
+        LogErrorAt(where, "%s:%d Failed to close the account stores, errno=%d", errno);
+    const bool unlocked = change.End();
+    TLIBScemdNotify(kAccountsChanged);
+    return unlocked ? 0 : Fail(ERR_UNLOCK_FAILED, where);
 }
 
 extern "C" int TAVOUserDBDump(TAVOUSERDB *pDb)

@@ -121,17 +121,10 @@ extern "C" int TAVOUserDelete(const char *const *rgszName, int nUser)
                 return Fail(code);
             }
         }
-        if (doomed.empty()) {
-            if (change.Session().Seal(tavo::AccountSession::Texts::as_before) != 0)
-                LogError("%s:%d Failed to close the account stores, errno=%d", errno);
-        } else {
+        if (!doomed.empty()) {
             TellServices(doomed);
             PlanRemoval(doomed, change);
-            if (tavo::CommitUsers(change) != 0)
-                return -1;
         }
-        const bool unlocked = change.End();
-        TLIBScemdNotify(tavo::kAccountsChanged);
-        return unlocked ? 0 : Fail(ERR_UNLOCK_FAILED);
+        return tavo::FinishUsers(change, !doomed.empty());
     });
 }

@@ -90,16 +90,8 @@ extern "C" int TAVOUserSet(const char *const *rgszOldName, const TAVOUSER *const
         if (tavo::ReadSetting(tavo::kFactorySettings, "support_download", "yes").value_or(false) &&
             TAVOSchedulerHup(tavo::kReadAccountsAgain) != 0)
             LogError("%s:%d Failed to signal scheduled.");
-        if (batch.Done().empty()) {
-            if (change.Session().Seal(tavo::AccountSession::Texts::as_before) != 0)
-                LogError("%s:%d Failed to close the account stores, errno=%d", errno);
-        } else {
+        if (!batch.Done().empty())
             PlanFollowUp(batch.Done(), change);
-            if (tavo::CommitUsers(change) != 0)
-                return -1;
-        }
-        const bool unlocked = change.End();
-        TLIBScemdNotify(tavo::kAccountsChanged);
-        return unlocked ? 0 : Fail(ERR_UNLOCK_FAILED);
+        return tavo::FinishUsers(change, !batch.Done().empty());
     });
 }

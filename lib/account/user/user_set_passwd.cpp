@@ -98,12 +98,6 @@ extern "C" int TAVOUserSetPasswd(const TAVOUSER *const *rgpUser, const char *con
                 return -1;
             changed = changed || outcome.code == 0;
         }
-        if (changed && tavo::CommitUsers(change) != 0)
-            return -1;
-        if (!changed && change.Session().Seal(tavo::AccountSession::Texts::as_before) != 0)
-            LogError("%s:%d Failed to close the account stores, errno=%d", errno);
-        const bool unlocked = change.End();
-        TLIBScemdNotify(tavo::kAccountsChanged);
-        return unlocked ? 0 : Fail(ERR_UNLOCK_FAILED);
+        return tavo::FinishUsers(change, changed);
     });
 }
