@@ -222,8 +222,8 @@ TAVO_API int RAIDDiskIsUsedByRAID(const char *szDisk, int *pnArray);
 TAVO_API int RAIDCreate(const RAIDREQUEST *pRequest);
 
 /* Starts an array from the members that carry its UUID, or from the members of a record. When members
- * of the record are missing, but enough are present for a degraded array, it is started by their UUID. A reshape that was
- * interrupted goes on.
+ * of the record are missing, but enough are present for a degraded array, it is started by their UUID. A reshape, rebuild
+ * or resync that was interrupted goes on.
  * Files: /sys/block/mdN/md
  * Runs: /bin/echo, /sbin/mdadm */
 TAVO_API int RAIDAssemble(const char *szPath, const char *szUuid);

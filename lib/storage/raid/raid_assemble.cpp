@@ -6,7 +6,7 @@
 #include "storage/detail/array_name.h"
 #include "storage/detail/mdadm_examine.h"
 #include "storage/detail/partition_command.h"
-#include "storage/detail/reshape.h"
+#include "storage/detail/unfinished_array.h"
 
 extern "C" int RAIDAssemble(const char *szPath, const char *szUuid)
 {
@@ -18,7 +18,7 @@ extern "C" int RAIDAssemble(const char *szPath, const char *szUuid)
     return Guard([&] {
         const auto result = tavo::RunDiskCommand("/sbin/mdadm -A %s -u %s > /dev/null 2>&1", szPath, szUuid);
         if (result.status == 0) {
-            tavo::GoOnReshaping(*number);
+            tavo::GoOnWithArray(*number);
             return 0;
         }
         LogError("%s:%d Failed to do '%s', err=%d", result.command, result.status);

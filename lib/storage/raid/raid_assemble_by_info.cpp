@@ -9,7 +9,7 @@
 #include "storage/detail/mdadm_examine.h"
 #include "storage/detail/open_disk.h"
 #include "storage/detail/partition_command.h"
-#include "storage/detail/reshape.h"
+#include "storage/detail/unfinished_array.h"
 
 #include <string>
 #include <vector>
@@ -81,7 +81,7 @@ extern "C" int RAIDAssembleByInfo(const RAIDINFO *pInfo)
         auto result =
             tavo::RunDiskCommand("/sbin/mdadm -A %s%s > /dev/null 2>&1", pInfo->szPath, tavo::ComposedPiece{members});
         if (result.status == 0) {
-            tavo::GoOnReshaping(*number);
+            tavo::GoOnWithArray(*number);
             return 0;
         }
         const Remaining remaining = Look(*pInfo);
@@ -89,7 +89,7 @@ extern "C" int RAIDAssembleByInfo(const RAIDINFO *pInfo)
         if (remaining.status == RAID_STATUS_DEGRADED) {
             result = tavo::RunDiskCommand("/sbin/mdadm -A %s -u %s > /dev/null 2>&1", pInfo->szPath, remaining.uuid);
             if (result.status == 0) {
-                tavo::GoOnReshaping(*number);
+                tavo::GoOnWithArray(*number);
                 return 0;
             }
         }

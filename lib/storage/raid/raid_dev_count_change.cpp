@@ -5,7 +5,21 @@
 #include "core/detail/log.h"
 #include "storage/detail/array_name.h"
 #include "storage/detail/kernel_reach.h"
+#include "storage/detail/kernel_text.h"
 #include "storage/detail/partition_command.h"
+
+namespace {
+
+// A RAID 6 that was a RAID 5 has its second parity on its last member. mdadm reshapes it only when told to keep it so.
+bool HasLayoutOfRaid5(const char *path)
+{
+    constexpr uint64_t first_such = 16;
+    const int number = tavo::ArrayNumber(path).value_or(0);
+    return tavo::KernelText(tavo::ArrayFile(number, "md/level")) == "raid6" &&
+           tavo::KernelNumber(tavo::ArrayFile(number, "md/layout")).value_or(0) >= first_such;
+}
+
+}  // namespace
 
 extern "C" int RAIDDevCountChange(const RAIDINFO *pInfo, int nSlot)
 {
@@ -21,7 +35,10 @@ extern "C" int RAIDDevCountChange(const RAIDINFO *pInfo, int nSlot)
             LogError("%s:%d %s", beyond);
             return -1;
         }
-        const auto result = tavo::RunDiskCommand("/sbin/mdadm --grow %s -n %d >/dev/null 2>&1\n", pInfo->szPath, nSlot);
+        auto result = tavo::RunDiskCommand("/sbin/mdadm --grow %s -n %d >/dev/null 2>&1\n", pInfo->szPath, nSlot);
+        if (result.status != 0 && HasLayoutOfRaid5(pInfo->szPath))
+            result = tavo::RunDiskCommand("/sbin/mdadm --grow %s -n %d --layout=preserve > /dev/null 2>&1",
+                                          pInfo->szPath, nSlot);
         if (result.status == 0)
             return 0;
         LogError("%s:%d Failed to do '%s', err=%d", result.command, result.status);

@@ -258,11 +258,19 @@ TEST_P(MachineArrays, Raid5BecomesRaid6)
               0);
     Told("dd if=/dev/urandom of=/dev/md2 bs=1M count=64 conv=fsync");
     const std::string sum = Told("head -c 64M /dev/md2 | md5sum");
+    const test::CommandResult refused = Shell("tavoctl raid migrate --yes md2 sdd sde");
+    EXPECT_EQ(refused.status, 1);
+    EXPECT_THAT(refused.output, HasSubstr("1 is fewer than the 4 that it will have"));
     const Array array = ReadArray("/dev/md2");
+    EXPECT_EQ(array->fLevel, RAID_LEVEL_5);
     EXPECT_EQ(RAIDMigrate2RAID6(array.get(), test::MakeList({"/dev/sdd"}).get()), 0);
     EXPECT_EQ(ReadArray("/dev/md2")->fLevel, RAID_LEVEL_6);
     EXPECT_TRUE(BecomesNormal("/dev/md2"));
     EXPECT_EQ(ReadArray("/dev/md2")->nSlot, 4);
+    // Its parity is not where mdadm expects it.
+    Told("tavoctl raid grow --yes --wait md2 sde");
+    EXPECT_EQ(MembersOf("/dev/md2", RAID_MEMBER_ACTIVE).size(), 5u);
+    EXPECT_EQ(Told("head -c 64M /dev/md2 | md5sum"), sum);
 
     // Any two disks may go now.
     test::FailMember("/dev/md2", "/dev/sda");
@@ -270,7 +278,7 @@ TEST_P(MachineArrays, Raid5BecomesRaid6)
     Told("echo 3 >/proc/sys/vm/drop_caches");
     EXPECT_EQ(StatusOf("/dev/md2"), RAID_STATUS_DEGRADED);
     EXPECT_EQ(Told("head -c 64M /dev/md2 | md5sum"), sum);
-    EXPECT_EQ(RAIDMigrate2RAID6(ReadArray("/dev/md2").get(), test::MakeList({"/dev/sde"}).get()), -1);
+    EXPECT_EQ(RAIDMigrate2RAID6(ReadArray("/dev/md2").get(), test::MakeList({"/dev/sdf"}).get()), -1);
 }
 
 TEST_P(MachineArrays, AReshapeGoesOnWhenItsArrayIsStartedAgain)

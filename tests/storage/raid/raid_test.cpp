@@ -485,19 +485,50 @@ TEST_F(Raid, AssemblesWhatIsLeftOfTheMembers)
     }
 }
 
-// Readers of an array in the middle of a reshape, which the kernel has started for reading only, wait for its first write.
-TEST_F(Raid, AReshapeThatWasInterruptedGoesOn)
+// The kernel has started them for reading only: a rebuild waits for the first write, and so do readers of a reshape.
+TEST_F(Raid, WhatWasInterruptedGoesOn)
 {
     RAIDMEMBER member = {"/dev/sda3", 1, nullptr};
     const RAIDINFO info = Record(RAID_LEVEL_5, &member);
-    const std::pair<const char *, const char *> rows[] = {
-        {"read-auto", "30720"}, {"read-auto", "none"}, {"clean", "30720"}};
+    const struct {
+        const char *state, *reshape, *resync, *degraded, *member;
+    } rows[] = {
+        {"read-auto", "30720", "none", "0", "in_sync"}, {"read-auto", "none", "none", "1", "spare"},
+        {"read-auto", "none", "2048", "0", "in_sync"},  {"read-auto", "none", "none", "0", "spare"},
+        {"read-auto", "none", "none", "1", "in_sync"},  // a pulled disk may come back
+        {"read-auto", "none", "0", "", "in_sync"},      // without redundancy
+        {"clean", "30720", "none", "1", "spare"},
+    };
     for (const auto &row : rows) {
-        tree_.Put("/sys/block/md5/md/array_state", row.first + std::string("\n"));
-        tree_.Put("/sys/block/md5/md/reshape_position", row.second + std::string("\n"));
-        story_.Head(row.first + std::string(", at ") + row.second);
+        const std::string folder = "/sys/block/md5/md/";
+        tree_.Put(folder + "array_state", row.state + std::string("\n"));
+        tree_.Put(folder + "reshape_position", row.reshape + std::string("\n"));
+        tree_.Put(folder + "resync_start", row.resync + std::string("\n"));
+        tree_.Put(folder + "degraded", row.degraded + std::string("\n"));
+        tree_.Put(folder + "dev-sda3/state", row.member + std::string("\n"));
+        story_.Head(row.state + std::string(", reshape at ") + row.reshape + ", resync at " + row.resync +
+                    ", degraded '" + row.degraded + "', its member " + row.member);
         TELL(RAIDAssemble("/dev/md5", "b7e9ed0e:bf1ea758:5bf5fba6:7c359649"));
         TELL(RAIDAssembleByInfo(&info));
+    }
+}
+
+// mdadm changes a RAID 6 that was a RAID 5 only with the option that keeps the parity where it is.
+TEST_F(Raid, SlotsOfAMigratedArray)
+{
+    const RAIDINFO info = Record(RAID_LEVEL_6);
+    const std::string stated = "/sbin/mdadm --grow /dev/md5 -n 5 >/dev/null 2>&1\n";
+    const std::pair<const char *, const char *> rows[] = {{"raid6", "18"}, {"raid6", "2"}, {"raid10", "258"}};
+    for (const auto &row : rows) {
+        tree_.Put("/sys/block/md5/md/level", row.first + std::string("\n"));
+        tree_.Put("/sys/block/md5/md/layout", row.second + std::string("\n"));
+        for (const bool refused : {true, false}) {
+            commands_.OnCommand([&](const std::string &command) {
+                return CommandReply{refused && command == stated, ""};
+            });
+            story_.Head(row.first + std::string(" with layout ") + row.second + (refused ? ", refused" : ""));
+            TELL(RAIDDevCountChange(&info, 5));
+        }
     }
 }
 

@@ -12,10 +12,12 @@ import re
 import selectors
 import shlex
 import shutil
+import signal
 import socket
 import struct
 import subprocess
 import tempfile
+import threading
 import time
 
 TOOLS = os.path.dirname(os.path.realpath(__file__))
@@ -136,6 +138,65 @@ class _Monitor:
             self.events.append(json.loads(self._line()))
 
 
+class SilentDrive:
+    """A drive whose requests another process serves, which can be stopped.
+
+    When a kernel resets a drive the emulator waits for the requests to it and does nothing else meanwhile, where a real
+    one forgets them. So whenever it does not answer the drive goes on for a moment, which gives the reset its way."""
+
+    def __init__(self, disk):
+        self.folder = tempfile.mkdtemp(prefix='tavo-silent.')
+        self.path = os.path.join(self.folder, 'socket')
+        self.process = subprocess.Popen(
+            ['setpriv', '--pdeathsig', 'KILL', 'qemu-storage-daemon', '--blockdev',
+             f'driver=file,node-name=disk,filename=/proc/self/fd/{disk.fileno()},locking=off',
+             '--nbd-server', f'addr.type=unix,addr.path={self.path}',
+             '--export', 'type=nbd,id=disk,node-name=disk,name=disk,writable=on'],
+            stdin=subprocess.DEVNULL, pass_fds=[disk.fileno()], process_group=0)
+        self.monitor = self.watcher = None
+        self.silent = False
+        while not os.path.exists(self.path):
+            if self.process.poll() is not None:
+                raise Died('the silent drive ended')
+            time.sleep(0.02)
+
+    def found(self, monitor):
+        """The emulator has it open, and is asked by this monitor whether it goes on."""
+        self.monitor = monitor
+        shutil.rmtree(self.folder)
+
+    def stop(self):
+        self.process.send_signal(signal.SIGSTOP)
+        self.silent = True
+        self.watcher = threading.Thread(target=self._watch, daemon=True)
+        self.watcher.start()
+
+    def _watch(self):
+        while self.silent:
+            released = threading.Timer(0.5, self.process.send_signal, [signal.SIGCONT])
+            released.start()
+            try:
+                self.monitor('query-status')
+            except (Died, OSError):
+                return
+            finally:
+                released.cancel()
+                released.join()
+            if self.silent:
+                self.process.send_signal(signal.SIGSTOP)
+            time.sleep(0.1)
+
+    def go_on(self):
+        self.silent = False
+        self.watcher.join()
+        self.process.send_signal(signal.SIGCONT)
+
+    def close(self):
+        self.process.kill()
+        self.process.wait()
+        shutil.rmtree(self.folder, ignore_errors=True)
+
+
 class Machine:
     """with Machine(...) as machine: outcome = machine.run([...])"""
 
@@ -153,6 +214,7 @@ class Machine:
         self.process = None
         self.lines = {}
         self.disks = []
+        self.silent = {}
 
     def __enter__(self):
         try:
@@ -181,6 +243,9 @@ class Machine:
             line.close()
         self.lines = {}
         self.disks = []
+        for drive in self.silent.values():
+            drive.close()
+        self.silent = {}
 
     # Starting
 
@@ -213,6 +278,7 @@ class Machine:
                        f'rcupdate.rcu_cpu_stall_suppress=1 tavo.disks={hardware.disks}',
             '-chardev', line('console'), '-serial', 'chardev:console',
             '-chardev', line('monitor'), '-mon', 'chardev=monitor,mode=control',
+            '-chardev', line('watch'), '-mon', 'chardev=watch,mode=control',
             '-device', 'virtio-serial-pci', '-device', 'virtio-rng-pci',
             '-chardev', line('agent'), '-device', 'virtserialport,chardev=agent,name=agent',
             '-chardev', line('events'), '-device', 'virtserialport,chardev=events,name=events',
@@ -262,6 +328,8 @@ class Machine:
             peer.close()
         try:
             self.monitor = _Monitor(self.lines['monitor'])
+            for drive in self.silent.values():
+                drive.found(_Monitor(self.lines['watch']))
         except (Died, OSError) as problem:
             raise Died(self._last_words()) from problem
         self.selector = selectors.DefaultSelector()
@@ -271,12 +339,13 @@ class Machine:
         self.received = {'agent': b'', 'events': b''}
 
     def _filter(self, bay, node, inherited):
-        """What the emulator has between a drive and its file, by its driver: 'blkdebug' fails requests; 'throttle' may
-        stop answering, see stall(); 'blklogwrites' writes what comes in into the open file 'log'."""
+        """What the emulator has between a drive and its file, by its driver: 'blkdebug' fails requests; 'nbd' may stop
+        answering, see stall(); 'blklogwrites' writes what comes in into the open file 'log'."""
         words = []
-        if node['driver'] == 'throttle':
-            node['throttle-group'] = f'pace{bay}'
-            words += ['-object', json.dumps({'qom-type': 'throttle-group', 'id': f'pace{bay}', 'limits': {}})]
+        if node['driver'] == 'nbd':
+            drive = self.silent[bay] = SilentDrive(self.disks[bay - 1])
+            node.update(server={'type': 'unix', 'path': drive.path}, export='disk')
+            return ['-blockdev', json.dumps({'node-name': f'disk{bay}', **node})]
         if node['driver'] == 'blklogwrites':
             log = node['log']
             inherited.append(log.fileno())
@@ -288,9 +357,9 @@ class Machine:
         return [*words, '-blockdev', json.dumps({'node-name': f'disk{bay}', **node})]
 
     def stall(self, bay, stalled=True):
-        """Has a drive with the filter 'throttle' answer a request of 64 KiB after 8 s, or go on. When the kernel resets a drive
-        that does not answer at all, the whole emulator waits for it."""
-        self.monitor('qom-set', path=f'/objects/pace{bay}', property='limits', value={'bps-total': 8192 if stalled else 0})
+        """Has a drive with the driver 'nbd' answer nothing that reads or writes, or go on."""
+        drive = self.silent[bay]
+        drive.stop() if stalled else drive.go_on()
 
     def _bay(self, bay):
         if self.hardware.bus == 'sata':

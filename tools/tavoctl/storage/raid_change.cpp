@@ -86,11 +86,11 @@ uint64_t RoomBeforeData(const std::string &member)
 // Spread over more members, data moves towards their beginning. With enough room there it never moves onto what has not been
 // moved yet. Without it mdadm keeps a copy of the first stripes meanwhile; when the power fails before that is written, the
 // array does not start any more.
-void RefuseUnsafeReshape(const RAIDINFO &array, int old_slots, int new_slots, const std::string &attempted)
+void RefuseUnsafeReshape(const RAIDINFO &array, int level, int old_slots, int new_slots, const std::string &attempted)
 {
-    if (array.fLevel != RAID_LEVEL_5 && array.fLevel != RAID_LEVEL_6)
+    if ((level != RAID_LEVEL_5 && level != RAID_LEVEL_6) || old_slots == new_slots)
         return;
-    const int parity = RAIDParityDiskCount(array.fLevel, old_slots);
+    const int parity = RAIDParityDiskCount(level, old_slots);
     const int data = old_slots - parity;
     const auto chunk =
         std::strtoull(KernelText(ArrayFile(array.szPath, "chunk_size")).value_or("").c_str(), nullptr, 10);
@@ -108,7 +108,7 @@ void GrowSlots(Call &call, const RAIDINFO &array, const std::vector<std::string>
 {
     const std::string name = array.szPath;
     const int slots = array.nSlot + static_cast<int>(paths.size());
-    RefuseUnsafeReshape(array, array.nSlot, slots, attempted);
+    RefuseUnsafeReshape(array, array.fLevel, array.nSlot, slots, attempted);
     RefuseTwice(paths, attempted);
     RefuseUsed(paths, attempted);
     RefuseTooLarge(SizeToBe(array.fLevel, {}, slots, array.cbMember), attempted);
@@ -245,6 +245,15 @@ Action RaidMigrate(Arguments &in)
         FailIf(array->fLevel != RAID_LEVEL_5, attempted, "it is a " + LevelText(array->fLevel));
         const std::vector<std::string> paths = DevicePaths(*words);
         RefuseUsed(paths, attempted);
+        if (paths.size() > 1) {  // the level cannot be changed back when the other members do not fit
+            const int slots = array->nSlot + 1;
+            const int wanted = static_cast<int>(paths.size()) - 1;
+            FailIf(wanted < slots, attempted,
+                   "its slots become the new members minus 1, and " + std::to_string(wanted) + " is fewer than the " +
+                       std::to_string(slots) + " that it will have",
+                   "name one; raid grow adds others");
+            RefuseUnsafeReshape(*array, RAID_LEVEL_6, slots, wanted, attempted);
+        }
         call.Change(array->szPath, "level", LevelText(array->fLevel), LevelText(RAID_LEVEL_6));
         call.Change(array->szPath, "members", {}, paths);
         if (!call.Proceed(LossOf(paths)))

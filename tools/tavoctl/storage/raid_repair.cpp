@@ -98,11 +98,11 @@ StoppedArray FindStopped(const std::string &path, const std::string &uuid, bool 
     return found[0];
 }
 
-// Readers of an array in the middle of a reshape wait as long as the kernel holds it for reading only.
+// The kernel starts arrays for reading only, until something is written. A rebuild waits for that, and so do readers of an
+// array in the middle of a reshape.
 void GoOn(const std::string &path, const std::string &attempted)
 {
-    if (KernelText(ArrayFile(path, "array_state")) == "read-auto" &&
-        KernelText(ArrayFile(path, "reshape_position")).value_or("none") != "none")
+    if (KernelText(ArrayFile(path, "array_state")) == "read-auto")
         SetKernelText(ArrayFile(path, "array_state"), "active", attempted);
 }
 
