@@ -306,6 +306,29 @@ TEST_P(MachineArrays, AReshapeGoesOnWhenItsArrayIsStartedAgain)
     EXPECT_EQ(MembersOf("/dev/md2", ~0).size(), 4u);
 }
 
+// Another program began to spread it, and the power failed before a copy of the first stripes was written.
+TEST_P(MachineArrays, AReshapeThatHasMovedNothingIsTakenBack)
+{
+    ASSERT_EQ(Make({.path = "/dev/md2",
+                    .level = RAID_LEVEL_5,
+                    .members = {"/dev/sda", "/dev/sdb", "/dev/sdc"},
+                    .sync = false}),
+              0);
+    Told("dd if=/dev/urandom of=/dev/md2 bs=1M count=32 conv=fsync");
+    const std::string sum = Told("head -c 32M /dev/md2 | md5sum");
+    Told("tavoctl raid add --yes md2 sdd && cd /sys/block/md2/md && echo 0 >sync_max && echo 4 >raid_disks && "
+         "echo reshape >sync_action && sleep 1");
+    ASSERT_EQ(RAIDStop("/dev/md2"), 0);
+    const test::CommandResult careful = Shell("tavoctl raid assemble --all");
+    EXPECT_EQ(careful.status, 1);
+    EXPECT_THAT(careful.output, HasSubstr("tavoctl raid assemble --force md2"));
+    EXPECT_FALSE(ReadArray("/dev/md2"));
+    Told("tavoctl raid assemble --yes --force md2");
+    EXPECT_EQ(ReadArray("/dev/md2")->nSlot, 3);
+    EXPECT_EQ(MembersOf("/dev/md2", ~RAID_MEMBER_ACTIVE), (std::vector<std::string>{"/dev/sdd"}));
+    EXPECT_EQ(Told("timeout 60 head -c 32M /dev/md2 | md5sum"), sum);
+}
+
 TEST_P(MachineArrays, RoomOnTheMembersIsSeen)
 {
     ASSERT_EQ(

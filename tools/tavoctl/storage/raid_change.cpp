@@ -9,9 +9,12 @@
 #include "storage/system_tool.h"
 
 #include <algorithm>
+#include <chrono>
+#include <csignal>
 #include <cstdlib>
 #include <numeric>
 #include <string_view>
+#include <thread>
 
 namespace tavoctl {
 namespace {
@@ -83,18 +86,25 @@ uint64_t RoomBeforeData(const std::string &member)
     return at == text.npos ? 0 : std::strtoull(text.c_str() + at + label.size(), nullptr, 10) / 2;
 }
 
-// Spread over more members, data moves towards their beginning. With enough room there it never moves onto what has not been
-// moved yet. Without it mdadm keeps a copy of the first stripes meanwhile; when the power fails before that is written, the
-// array does not start any more.
-void RefuseUnsafeReshape(const RAIDINFO &array, int level, int old_slots, int new_slots, const std::string &attempted)
+// The KiB by which the data of each member moves towards its beginning when it is spread over more of them; 0 for levels
+// whose data does not move.
+uint64_t ReshapeDistance(const RAIDINFO &array, int level, int old_slots, int new_slots)
 {
     if ((level != RAID_LEVEL_5 && level != RAID_LEVEL_6) || old_slots == new_slots)
-        return;
+        return 0;
     const int parity = RAIDParityDiskCount(level, old_slots);
     const int data = old_slots - parity;
     const auto chunk =
         std::strtoull(KernelText(ArrayFile(array.szPath, "chunk_size")).value_or("").c_str(), nullptr, 10);
-    const uint64_t needed = chunk / 1024 * static_cast<uint64_t>(std::lcm(data, new_slots - parity) / data);
+    return chunk / 1024 * static_cast<uint64_t>(std::lcm(data, new_slots - parity) / data);
+}
+
+// With enough room before the data it never moves onto what has not been moved yet. Without it mdadm keeps a copy of the
+// first stripes meanwhile; when the power fails before that is written, the array does not start any more.
+void RefuseUnsafeReshape(const RAIDINFO &array, uint64_t needed, const std::string &attempted)
+{
+    if (needed == 0)
+        return;
     for (const std::string &member : Members(array, ~0)) {
         const uint64_t room = RoomBeforeData(member);
         FailIf(room < needed, attempted,
@@ -104,11 +114,54 @@ void RefuseUnsafeReshape(const RAIDINFO &array, int level, int old_slots, int ne
     }
 }
 
+// No signal ends the program in between: the array would wait for ever.
+class Undisturbed {
+public:
+    Undisturbed()
+    {
+        sigset_t signals;
+        ::sigemptyset(&signals);
+        for (const int number : {SIGINT, SIGQUIT, SIGTERM, SIGHUP})
+            ::sigaddset(&signals, number);
+        ::sigprocmask(SIG_BLOCK, &signals, &before_);
+    }
+    ~Undisturbed() { ::sigprocmask(SIG_SETMASK, &before_, nullptr); }
+    Undisturbed(const Undisturbed &) = delete;
+    Undisturbed &operator=(const Undisturbed &) = delete;
+
+private:
+    sigset_t before_;
+};
+
+// The kernel writes down how far a reshape is before it overwrites what was moved since. But it counts with the room before
+// the data only from the next start of the array on, so a power failure in the first seconds would lose the first stripes.
+// Stopped where that room ends, it writes down that they were moved.
+void SpreadOver(const RAIDINFO &array, int slots, uint64_t distance, const std::string &attempted)
+{
+    const std::string limit = ArrayFile(array.szPath, "sync_max");
+    const uint64_t sectors = distance * 2;
+    const Undisturbed undisturbed;
+    if (sectors > 0)
+        SetKernelText(limit, std::to_string(sectors), attempted);
+    const bool begun = RAIDDevCountChange(&array, slots) == 0;
+    const uint64_t moved = sectors * static_cast<uint64_t>(slots - RAIDParityDiskCount(array.fLevel, slots));
+    while (begun && sectors > 0 && KernelText(ArrayFile(array.szPath, "sync_action")) == "reshape") {
+        const std::string position = KernelText(ArrayFile(array.szPath, "reshape_position")).value_or("none");
+        if (position == "none" || std::strtoull(position.c_str(), nullptr, 10) >= moved)
+            break;
+        std::this_thread::sleep_for(std::chrono::milliseconds(100));
+    }
+    if (sectors > 0)
+        SetKernelText(limit, "max", attempted);
+    Must(begun, attempted, log_hint);
+}
+
 void GrowSlots(Call &call, const RAIDINFO &array, const std::vector<std::string> &paths, const std::string &attempted)
 {
     const std::string name = array.szPath;
     const int slots = array.nSlot + static_cast<int>(paths.size());
-    RefuseUnsafeReshape(array, array.fLevel, array.nSlot, slots, attempted);
+    const uint64_t distance = ReshapeDistance(array, array.fLevel, array.nSlot, slots);
+    RefuseUnsafeReshape(array, distance, attempted);
     RefuseTwice(paths, attempted);
     RefuseUsed(paths, attempted);
     RefuseTooLarge(SizeToBe(array.fLevel, {}, slots, array.cbMember), attempted);
@@ -119,7 +172,7 @@ void GrowSlots(Call &call, const RAIDINFO &array, const std::vector<std::string>
     for (const std::string &path : paths)
         Must(RAIDAddRobustCheck(&array, path.c_str()) == 0, "add " + path + " to " + name,
              HintFor{ERR_NOT_ENOUGH_SPACE, "take a larger one", log_hint});
-    Must(RAIDDevCountChange(&array, slots) == 0, attempted, log_hint);
+    SpreadOver(array, slots, distance, attempted);
 }
 
 }  // namespace
@@ -252,7 +305,7 @@ Action RaidMigrate(Arguments &in)
                    "its slots become the new members minus 1, and " + std::to_string(wanted) + " is fewer than the " +
                        std::to_string(slots) + " that it will have",
                    "name one; raid grow adds others");
-            RefuseUnsafeReshape(*array, RAID_LEVEL_6, slots, wanted, attempted);
+            RefuseUnsafeReshape(*array, ReshapeDistance(*array, RAID_LEVEL_6, slots, wanted), attempted);
         }
         call.Change(array->szPath, "level", LevelText(array->fLevel), LevelText(RAID_LEVEL_6));
         call.Change(array->szPath, "members", {}, paths);
