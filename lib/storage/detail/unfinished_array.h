@@ -23,8 +23,8 @@ inline bool IsUnfinished(int number)
         return degraded.has_value();
     const auto names = MemberNames(number);
     return *degraded > 0 && std::any_of(names.begin(), names.end(), [&](const std::string &name) {
-               return KernelText(ArrayFile(number, "md/dev-" + name + "/state")) == "spare";
-           });
+        return KernelText(ArrayFile(number, "md/dev-" + name + "/state")) == "spare";
+    });
 }
 
 // Has the kernel go on with what a power failure interrupted. Many kernels start arrays for reading only, until something

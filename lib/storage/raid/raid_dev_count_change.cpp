@@ -10,7 +10,7 @@
 
 namespace {
 
-// A RAID 6 that was a RAID 5 has its second parity on its last member. mdadm reshapes it only when told to keep it so.
+// A RAID 6 that was a RAID 5 has its second parity on its last member. mdadm changes it only with that option.
 bool HasLayoutOfRaid5(const char *path)
 {
     constexpr uint64_t first_such = 16;

@@ -116,7 +116,7 @@ void RefuseUnsafeReshape(const RAIDINFO &array, uint64_t needed, const std::stri
 
 // No signal ends the program in between: the array would wait for ever.
 class Undisturbed {
-public:
+  public:
     Undisturbed()
     {
         sigset_t signals;
@@ -129,7 +129,7 @@ public:
     Undisturbed(const Undisturbed &) = delete;
     Undisturbed &operator=(const Undisturbed &) = delete;
 
-private:
+  private:
     sigset_t before_;
 };
 
