@@ -12,9 +12,6 @@
 
 #include <gtest/gtest.h>
 
-#include <algorithm>
-#include <functional>
-
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
