@@ -1,4 +1,4 @@
-// Users, groups, quotas and their stores: alice and bob, who are in the group staff.
+// Users, groups, quotas and their stores: alice and bob, who are in the group staff, and a user with an accent.
 #include "arguments.h"
 #include "support/test.h"
 
@@ -31,7 +31,7 @@ struct Accounts {
     {
         const test::CapturedLog quiet;
         std::filesystem::create_directories("/tmp/every_call");
-        for (const char *name : {"alice", "bob"})
+        for (const char *name : {"alice", "bob", "zo\xC3\xAB"})
             EXPECT_EQ(TAVOUserSetOne(nullptr, OneUser(name)), 0);
         EXPECT_EQ(TAVOGroupSet(nullptr, OneGroup("staff")), 0);
         EXPECT_EQ(TAVOGroupDescSet("staff", "old hands"), 0);
@@ -120,15 +120,17 @@ Family AccountFamily()
             CALL(TAVOUserExpiredDateGet, 0, OneUser("alice"), Text<32>(), 32),
             CALL(TAVOUserFree, 0, OneUser("carol").Release()),
             CALL(TAVOUserGet, 0, "alice", Made<TAVOUserFree>()),
-            CALL(TAVOUserGetByUID, 0, 0, Made<TAVOUserFree>()),
+            CALL(TAVOUserGet, 0, "zo\xC3\xAB", Made<TAVOUserFree>()),
+            CALL(TAVOUserGetByUID, 0, 1025, Made<TAVOUserFree>()),
             CALL(TAVOUserGetValidUserList, 0, Texts{"alice", "nobody there", nullptr}, Text<64>(), 64),
             CALL(TAVOUserIsExpired, 0, 1),
             CALL(TAVOUserLockSet, 0, "alice", 1),
             CALL(TAVOUserPrivilegeGet, 0, "alice"),
             CALL(TAVOUserRandomNumMap2Seed, 0, 1),
             CALL(TAVOUserRemoveTmpFiles, kAnswers),
-            CALL(TAVOUserSet, kLeavesCode, Texts{nullptr}, OneUser("carol"), 1),
+            CALL(TAVOUserSet, kLeavesCode, Texts{nullptr}, OneUser("dave"), 1),
             CALL(TAVOUserSetOne, kLeavesCode, "bob", OneUser("robert")),
+            CALL(TAVOUserSetOne, kLeavesCode, "bob", OneUser("bob")),
             CALL(TAVOUserSetPasswd, kLeavesCode, OneUser("alice"), Texts{"$1$abcdefgh$NGjcfXeLg.0fo4FzMqUTu1"},
                  Texts{kNoHash}, Texts{kNoHash}, 1),
             CALL(TAVOUserTotalNum, 0, 1),
@@ -149,8 +151,10 @@ Family AccountFamily()
             CALL(TAVOGroupEnumBySubstr, 0, ListOf({}), 1, "taf"),
             CALL(TAVOGroupFree, 0, OneGroup("staff").Release()),
             CALL(TAVOGroupGet, 0, "staff", Made<TAVOGroupFree>()),
-            CALL(TAVOGroupGetByGID, 0, 0, Made<TAVOGroupFree>()),
+            CALL(TAVOGroupGetByGID, 0, 101, Made<TAVOGroupFree>()),
             CALL(TAVOGroupListMember, 0, "staff", ListOf({})),
+            CALL(TAVOGroupListMember, 0, "users", ListOf({})),
+            CALL(TAVOGroupSet, 0, nullptr, OneGroup("crew")),
             CALL(TAVOGroupSet, 0, "staff", OneGroup("crew")),
             CALL(TAVOGroupTotalNum, 0, 1),
             CALL(TAVOUserModifyGroup, 0, HashOf({{"alice", "alicia"}})),

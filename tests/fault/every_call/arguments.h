@@ -64,6 +64,11 @@ struct Made {
     operator T() const { return made; }
     operator T *() { return &made; }
     T Release() { return std::exchange(made, T{}); }
+    void ShowIn(Trial &run) const
+    {
+        if constexpr (std::is_pointer_v<T> && requires { run.Show(made); })
+            run.Show(made);
+    }
 };
 
 // Words, which end with a null pointer.

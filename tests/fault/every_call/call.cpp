@@ -74,6 +74,25 @@ void Trial::Show(const TLIBSZHASH *hash)
     }
 }
 
+void Trial::Show(const TAVOUSER *user)
+{
+    if (!user)
+        return;
+    for (const char *text : {user->szName, user->szPasswd, user->szHome, user->szMail})
+        Show(std::string_view(text ? text : "(null)"));
+    Show(static_cast<long long>(user->nUid));
+    Show(static_cast<long long>(user->nPrivilege));
+}
+
+void Trial::Show(const TAVOGROUP *group)
+{
+    if (!group)
+        return;
+    Show(std::string_view(group->szName));
+    for (char **member = group->rgszMember; *member; ++member)
+        Show(std::string_view(*member));
+}
+
 bool WasFailed(long result)
 {
     return result == -1 && (errno == EIO || errno == ENOSPC || errno == EACCES || errno == EMFILE || errno == EINTR);

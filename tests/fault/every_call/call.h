@@ -78,6 +78,8 @@ class Trial {
     void Show(long long number);
     void Show(const TLIBSZLIST *list);
     void Show(const TLIBSZHASH *hash);
+    void Show(const TAVOUSER *user);
+    void Show(const TAVOGROUP *group);
 
   private:
     void Begin();
