@@ -400,6 +400,8 @@ TEST_F(Refusals, Services)
     static TAVOEBOX *box = nullptr;
     static const TAVOEBOX unit = {};
     static TAVOSERVICESHARE share;
+    const TAVOSERVICE *const row = TAVOServiceInfoGet(0);
+    const Argument<int> action = {TAVO_SERVICE_START, -1, 7};
 
     Refuses("ebox_info_enum", TAVOEBoxInfoEnum, &box);
     Refuses("ebox_is_poweron", TAVOEBoxIsPoweron, &unit);
@@ -407,30 +409,45 @@ TEST_F(Refusals, Services)
     Refuses("push_duser_used", TAVOPushDUserUsed, {&list_, &no_list});
     Refuses("user_modify_smb_conf", TAVOUserModifySmbConf, hash_);
     Refuses("service_action_set", TAVOServiceActionSet, {0, -1, 31}, TAVO_SERVICE_START);
-    Refuses("service_daemon_get", TAVOServiceDaemonGet, {"none", ""});
+    Refuses("service_daemon_get", TAVOServiceDaemonGet, "none");
     Refuses("service_data_search", TAVOServiceDataSearch, 1, text, 64);
-    Refuses("service_disable_set", TAVOServiceDisableSet, {1, -1, 12});
-    Refuses("service_enable_get", TAVOServiceEnableGet, {1, -1, 12});
+    Refuses("service_disable_set", TAVOServiceDisableSet, {1, -1, 0, 8, 12});
+    Refuses("service_enable_get", TAVOServiceEnableGet, {1, -1, 0, 12});
     Refuses("service_get_all", TAVOServiceGetAll, {&list_, &no_list});
     Refuses("service_getby_volume", TAVOServiceGetbyVolume, {"/volume1", "/tmp"}, {&list_, &no_list});
-    Refuses("service_is_on_volume", TAVOServiceIsOnVolume, 1, {"/volume1", "/tmp"});
+    Refuses("service_interface", TAVOServiceDaemonIDGet, {0, -1, 31, 1000});
+    Refuses("service_interface", TAVOServiceIndexGet, "web");
+    Refuses("service_interface", TAVOServiceInfoGet, {0, -1, 31, 1000});
+    Refuses("service_interface", TAVOServiceNameGet, {0, -1, 31, 1000});
+    Refuses("service_interface", TAVOServiceShareIDGet, {0, -1, 31, 1000});
+    Refuses("service_interface", TAVOServiceTypeGet, {0, -1, 31, 1000});
+    Refuses("service_is_on_volume", TAVOServiceIsOnVolume, 1, {"/volume1", "/tmp", "", "/volume", "/volume2/"});
     Refuses("service_link_remove", TAVOServiceLinkRemove, {1, -1, 12});
     Refuses("service_link_set", TAVOServiceLinkSet, 1, {"/volume1/web", ""});
+    Refuses("service_net_service", TAVONetService, {TAVO_DAEMON_CRON, 0}, {TAVO_DAEMON_START, -1, 5});
     Refuses("service_new_volume_decide", TAVOServiceNewVolumeDecide, {1, -1, 12}, text, {64, 0});
     Refuses("service_remove", TAVOServiceRemove, {1, -1, 12}, 0);
     Refuses("service_removeby_id", TAVOServiceRemovebyID, {1, -1, 31}, 0);
-    Refuses("service_removeby_volume", TAVOServiceRemovebyVolume, {"/volume1", "/tmp"}, 0);
-    Refuses("service_restore", TAVOServiceRestore, {"/volume1", "/tmp"});
-    Refuses("service_setting_get", TAVOServiceSettingGet, {1, -1, 12}, &share);
+    Refuses("service_removeby_info", TAVOServiceRemovebyInfo, row, 0);
+    Refuses("service_removeby_volume", TAVOServiceRemovebyVolume,
+            {"/volume1", "/tmp", "", "/volume", "/volume0", "/volume1/", "volume1"}, 0);
+    Refuses("service_restore", TAVOServiceRestore, {"/volume1", "/tmp", "", "/volume", "/volume2/"});
+    Refuses("service_setting_get", TAVOServiceSettingGet, {1, -1, 0, 12}, &share);
     Refuses("service_share_gen", TAVOServiceShareGen, 1, {"/volume1", "/tmp"}, text, {64, 0});
     Refuses("service_share_is_empty", TAVOServiceShareIsEmpty, {1, -1, 12});
     Refuses("service_share_remove", TAVOServiceShareRemove, {1, -1, 12}, 0);
     Refuses("service_status_get", TAVOServiceStatusGet, {1, -1, 30});
     Refuses("service_std_action", TAVOServiceSTDAction, TAVOServiceInfoGet(0), {0, -1, 100});
+    for (const auto act : {TAVOServiceAFP, TAVOServiceAudio, TAVOServiceHTTPS, TAVOServiceNetBkp, TAVOServiceSAMBA,
+                           TAVOServiceSSH, TAVOServiceUserHome, TAVOServiceiTunes})
+        Refuses("service_std_action", act, row, action);
+    for (const auto ask : {TAVOServiceAFPStatus, TAVOServiceFTPStatus, TAVOServiceSSHStatus, TAVOServiceTelnetStatus,
+                           TAVOServiceiTunesStatus})
+        Refuses("service_std_status", ask, row);
     Refuses("service_std_status", TAVOServiceSTDStatus, {TAVOServiceInfoGet(0), TAVOServiceInfoGet(30)});
     Refuses("service_printer_status", TAVOServicePrinterStatus, {TAVOServiceInfoGet(0), TAVOServiceInfoGet(30)});
-    Refuses("service_telnet", TAVOServiceTelnet, TAVOServiceInfoGet(13), {TAVO_SERVICE_STOP, -1, 100});
-    Refuses("service_third_party_all", TAVOServiceThirdPartyAll, {"start", "begin", ""});
+    Refuses("service_telnet", TAVOServiceTelnet, TAVOServiceInfoGet(13), {TAVO_SERVICE_STOP, -1, 7, 100});
+    Refuses("service_third_party_all", TAVOServiceThirdPartyAll, {"start", "", "reload", "start; reboot"});
     Refuses("service_volume_getby_link", TAVOServiceVolumeGetbyLink, {"web", ""}, text, {64, 0}, text, {64, 0});
     Refuses("service_volume_getby_share", TAVOServiceVolumeGetbyShare, {"web", ""}, text, {64, 0});
 }

@@ -1,44 +1,27 @@
 // Restores the appliance root after each test: where tests share one root, no test finds the services of another.
 #include "service_root.h"
-#include "support/scratch_dir.h"
-
-#include <map>
+#include "support/file_snapshot.h"
+#include "support/test.h"
 
 namespace {
-
-namespace fs = std::filesystem;
 
 class CleanRoot : public testing::EmptyTestEventListener {
     void OnTestProgramStart(const testing::UnitTest &) override
     {
-        // Only in an appliance root: everything here is removed afterwards.
-        inside_ = fs::exists("/usr/tavo/etc/rc.table") && fs::exists("/var/standin");
-        for (auto &[path, text] : files_) {
-            if (inside_)
-                text = test::ReadFile(path);
-        }
+        // Only in an appliance root: everything here is put back afterwards.
+        if (std::filesystem::exists("/usr/tavo/etc/rc.table") && std::filesystem::exists("/var/standin"))
+            before_.emplace(std::vector<std::string>{"/etc", "/etc.defaults", "/usr/tavo/etc", "/var", "/tmp"});
     }
 
     void OnTestEnd(const testing::TestInfo &) override
     {
-        if (!inside_)
+        if (!before_)
             return;
-        std::error_code none;
         test::ResetStandins();
-        for (const char *folder : {"/var/run", "/tmp"}) {
-            for (const auto &entry : fs::directory_iterator(folder, none)) {
-                if (entry.path().extension() == ".pid")
-                    fs::remove(entry.path(), none);
-            }
-        }
-        fs::remove_all("/var/services", none);
-        for (const auto &[path, text] : files_)
-            test::WriteFile(path, text);
+        before_->Restore();
     }
 
-    bool inside_ = false;
-    std::map<std::string, std::string> files_ = {
-        {"/etc/tavoinfo.conf", ""}, {"/etc.defaults/tavoinfo.conf", ""}, {"/usr/tavo/etc/share.conf", ""}};
+    std::optional<test::FileSnapshot> before_;
 };
 
 [[maybe_unused]] const bool installed = [] {

@@ -7,19 +7,6 @@
 #include "support/test.h"
 
 using test::DaemonPid;
-using test::Eventually;
-using test::Fault;
-using test::FaultOf;
-
-using test::HasEnded;
-using test::IsUp;
-using test::LastFault;
-using test::LinkTarget;
-using test::ScriptCalls;
-using test::Setting;
-using test::WriteFile;
-using testing::IsEmpty;
-using testing::MatchesRegex;
 
 namespace {
 
@@ -164,7 +151,7 @@ class Every : public test::Services, public testing::WithParamInterface<Row> {
     int Act(int action) const { return TAVOServiceActionSet(row.id, action); }
 
     // The stack of databases is several services and has no status of its own.
-    bool IsOn() const { return row.id == kDatabases || IsUp(row.id); }
+    bool IsOn() const { return row.id == kDatabases || test::IsUp(row.id); }
 
     void ExpectBound(bool bound) const
     {
@@ -172,7 +159,7 @@ class Every : public test::Services, public testing::WithParamInterface<Row> {
             TAVOSERVICESHARE share;
             ASSERT_EQ(TAVOServiceSettingGet(*id, &share), bound);
             const std::string folder = std::string("/volume2/") + share.szShareName;
-            EXPECT_EQ(LinkTarget(share.szLink), bound ? folder : "");
+            EXPECT_EQ(test::LinkTarget(share.szLink), bound ? folder : "");
             EXPECT_TRUE(std::filesystem::is_directory(folder)) << "data is never deleted unasked";
             char volume[52];
             EXPECT_EQ(TAVOServiceVolumeGetbyShare(share.szShareName, volume, sizeof volume), bound ? 9 : 0);
@@ -190,7 +177,7 @@ class Every : public test::Services, public testing::WithParamInterface<Row> {
     {
         for (const std::string &daemon : row.daemons) {
             if (std::find(row.staying.begin(), row.staying.end(), daemon) == row.staying.end()) {
-                EXPECT_TRUE(HasEnded(daemon)) << daemon;
+                EXPECT_TRUE(test::HasEnded(daemon)) << daemon;
             }
         }
         for (const std::string &daemon : row.staying)
@@ -207,34 +194,34 @@ class WithPidFile : public Every {};
 TEST_P(Every, Action)
 {
     const std::string settings = test::ReadFile("/etc/tavoinfo.conf");
-    ScriptCalls();
+    test::ScriptCalls();
     if (row.id == kRestore) {
         for (const int action : {TAVO_SERVICE_ENABLE, TAVO_SERVICE_DISABLE, TAVO_SERVICE_RESTART})
-            EXPECT_EQ(FaultOf(Act(action)), (Fault{ERR_SERVICE_STD_ACTION, "service_action_set"}))
+            EXPECT_EQ(test::FaultOf(Act(action)), (test::Fault{ERR_SERVICE_STD_ACTION, "service_action_set"}))
                 << "it has no command";
         return;
     }
     if (key) {
         EXPECT_EQ(Act(TAVO_SERVICE_KEY_YES), 0);
-        EXPECT_EQ(Setting(key), "yes");
+        EXPECT_EQ(test::Setting(key), "yes");
         EXPECT_EQ(Act(TAVO_SERVICE_KEY_NO), 0);
-        EXPECT_EQ(Setting(key), "no");
+        EXPECT_EQ(test::Setting(key), "no");
         EXPECT_EQ(TAVOServiceStatusGet(row.id), 0);
-        EXPECT_THAT(ScriptCalls(), IsEmpty()) << "the key alone";
+        EXPECT_THAT(test::ScriptCalls(), testing::IsEmpty()) << "the key alone";
     }
     const auto expect = [&](int action, const Texts &scripts, const char *value, bool running) {
         SCOPED_TRACE(action);
         EXPECT_EQ(Act(action), 0);
-        EXPECT_EQ(ScriptCalls(), scripts);
+        EXPECT_EQ(test::ScriptCalls(), scripts);
         running ? ExpectRunning() : ExpectStopped();
         if (key) {
-            EXPECT_EQ(Setting(key), value);
+            EXPECT_EQ(test::Setting(key), value);
             ExpectBound(value == std::string("yes"));
         }
     };
     expect(TAVO_SERVICE_ENABLE, row.start, "yes", true);
     expect(TAVO_SERVICE_STOP, row.stop, "yes", false);
-    EXPECT_TRUE(Eventually([&] { return TAVOServiceStatusGet(row.id) == row.on_when_stopped; }));
+    EXPECT_TRUE(test::Eventually([&] { return TAVOServiceStatusGet(row.id) == row.on_when_stopped; }));
     expect(TAVO_SERVICE_START, row.start, "yes", true);
     std::map<std::string, pid_t> before;
     for (const std::string &daemon : row.daemons)
@@ -243,18 +230,18 @@ TEST_P(Every, Action)
     for (const std::string &daemon : row.daemons)
         EXPECT_NE(DaemonPid(daemon), before[daemon]) << daemon;
     expect(TAVO_SERVICE_DISABLE, row.stop, "no", false);
-    EXPECT_TRUE(Eventually([&] { return TAVOServiceStatusGet(row.id) == 0; })) << "whatever still runs";
+    EXPECT_TRUE(test::Eventually([&] { return TAVOServiceStatusGet(row.id) == 0; })) << "whatever still runs";
 
     for (const int action : key ? std::vector{-1, 7} : std::vector{-1, 5, 6, 7}) {
         log_.Clear();
-        EXPECT_EQ(FaultOf(Act(action)).code, ERR_BAD_PARAMETERS) << action;
+        EXPECT_EQ(test::FaultOf(Act(action)).code, ERR_BAD_PARAMETERS) << action;
         if (!key) {
-            EXPECT_THAT(log_.Texts(),
-                        testing::ElementsAre(MatchesRegex("service_action_set:[0-9]+ Illegal action with Daemon " +
-                                                          std::string(TAVOServiceNameGet(row.id)))));
+            EXPECT_THAT(log_.Texts(), testing::ElementsAre(testing::MatchesRegex(
+                                          "service_action_set:[0-9]+ Illegal action with Daemon " +
+                                          std::string(TAVOServiceNameGet(row.id)))));
         }
     }
-    EXPECT_THAT(ScriptCalls(), IsEmpty());
+    EXPECT_THAT(test::ScriptCalls(), testing::IsEmpty());
     if (!key) {
         EXPECT_EQ(test::ReadFile("/etc/tavoinfo.conf"), settings);
     }
@@ -263,15 +250,15 @@ TEST_P(Every, Action)
 // The key is written before the daemon is started: such a service is enabled and does not run.
 TEST_P(WithDaemon, DiesAtOnce)
 {
-    WriteFile("/var/standin/" + row.daemon + ".mode", "dies\n");
+    test::WriteFile("/var/standin/" + row.daemon + ".mode", "dies\n");
     EXPECT_EQ(Act(key ? TAVO_SERVICE_ENABLE : TAVO_SERVICE_START), row.dies);
     if (row.dies == failed) {
-        EXPECT_EQ(LastFault().code, ERR_SERVICE_STD_ACTION);
+        EXPECT_EQ(test::LastFault().code, ERR_SERVICE_STD_ACTION);
     }
     EXPECT_EQ(DaemonPid(row.daemon), 0);
     EXPECT_EQ(TAVOServiceStatusGet(row.id), key && row.on_when_stopped && row.id != 13);
     if (key) {
-        EXPECT_EQ(Setting(key), "yes");
+        EXPECT_EQ(test::Setting(key), "yes");
         ExpectBound(true);
     }
 }
@@ -281,14 +268,14 @@ TEST_P(WithDaemon, DoesNotEnd)
     ASSERT_EQ(Act(key ? TAVO_SERVICE_ENABLE : TAVO_SERVICE_START), 0);
     ASSERT_TRUE(IsOn());
     ASSERT_EQ(Act(TAVO_SERVICE_STOP), 0);
-    WriteFile("/var/standin/" + row.daemon + ".mode", "stubborn\n");
+    test::WriteFile("/var/standin/" + row.daemon + ".mode", "stubborn\n");
     ASSERT_EQ(Act(TAVO_SERVICE_START), 0);
     ASSERT_TRUE(IsOn());
     const pid_t before = DaemonPid(row.daemon);
 
     EXPECT_EQ(Act(TAVO_SERVICE_STOP), row.stubborn);
     if (row.stubborn == failed) {
-        EXPECT_EQ(LastFault().code, ERR_SERVICE_STD_ACTION);
+        EXPECT_EQ(test::LastFault().code, ERR_SERVICE_STD_ACTION);
     }
     EXPECT_EQ(DaemonPid(row.daemon), before) << "it was asked, and not killed";
     EXPECT_TRUE(IsOn()) << "so it is still on";
@@ -299,11 +286,11 @@ TEST_P(WithPidFile, CountsOnlyItsOwn)
 {
     for (const char *mode : {"garbage", "stale", "nopid", "late"}) {
         SCOPED_TRACE(mode);
-        WriteFile("/var/standin/" + row.daemon + ".mode", mode);
+        test::WriteFile("/var/standin/" + row.daemon + ".mode", mode);
         EXPECT_EQ(Act(key ? TAVO_SERVICE_ENABLE : TAVO_SERVICE_START), 0);
         EXPECT_TRUE(test::Runs(row.daemon));
         if (mode == std::string("late")) {
-            EXPECT_TRUE(IsUp(row.id));
+            EXPECT_TRUE(test::IsUp(row.id));
         } else {
             EXPECT_EQ(TAVOServiceStatusGet(row.id), 0);
         }
