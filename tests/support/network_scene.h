@@ -20,11 +20,10 @@ class NetworkScene : public testing::Test {
         cable_.emplace("cable");
         here_.emplace("here");
         cable_->Plug(*here_, "eth0");
-        EXPECT_TRUE(here_->Run([] {
+        here_->Do([] {
             WriteFile("/etc/sysconfig/network", "GATEWAY=192.0.2.99\nHOSTNAME=here\n");
             WriteFile(kIfcfg, "DEVICE=eth0\nONBOOT=yes\nBOOTPROTO=static\n");
-            return true;
-        }));
+        });
     }
 
     std::optional<VirtualCable> cable_;

@@ -146,6 +146,11 @@ bool Node::Run(const std::function<bool()> &body) const
            }) == 0;
 }
 
+void Node::Do(const std::function<void()> &body) const
+{
+    EXPECT_TRUE(Run([&] { return body(), true; }));
+}
+
 int Node::Shell(const std::string &command) const
 {
     return InFork([&] {

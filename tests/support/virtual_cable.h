@@ -20,6 +20,8 @@ class Node {
 
     // Runs the function there, in a process of its own; false when it fails an assertion, dies or returns false.
     bool Run(const std::function<bool()> &body) const;
+    // The same, for assertions alone.
+    void Do(const std::function<void()> &body) const;
     // Runs a command of the shell and returns its exit status.
     int Shell(const std::string &command) const;
     // Returns its output.

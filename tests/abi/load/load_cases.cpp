@@ -15,8 +15,6 @@
 
 namespace {
 
-using testing::ElementsAre;
-
 constexpr char kUmlauts[] = "gr\xC3\xBC\xC3\x9F";
 constexpr int kUpperSize = sizeof "GR\xC3\x9CSS";
 
@@ -100,7 +98,7 @@ void RefusesAll(void *library, const test::ScratchDir &folder, const char *why)
     ASSERT_TRUE(library);
     test::CapturedLog log;
     EXPECT_EQ(Upper(library, "plain"), 6);
-    EXPECT_THAT(log.Texts(), ElementsAre());
+    EXPECT_THAT(log.Texts(), testing::ElementsAre());
 
     errno = EXDEV;
     EXPECT_EQ(Upper(library, kUmlauts), -1);

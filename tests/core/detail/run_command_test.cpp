@@ -9,8 +9,6 @@
 
 using tavo::CommandOutput;
 using tavo::RunCommand;
-using test::ChildAction;
-using test::OpenDescriptors;
 
 namespace {
 
@@ -45,7 +43,7 @@ TEST(RunCommand, ReturnsTheStatusForEverySigchldSetting)
         int flags;
     } actions[] = {{SIG_DFL, 0}, {SIG_IGN, 0}, {SIG_DFL, SA_NOCLDWAIT}, {OnChild, 0}, {OnChild, SA_NOCLDWAIT}};
     for (const auto &action : actions) {
-        const ChildAction set(action.handler, action.flags);
+        const test::ChildAction set(action.handler, action.flags);
         for (const auto &row : rows) {
             EXPECT_EQ(RunCommand(row.command), row.status) << row.command;
             EXPECT_EQ(StatusOf(row.command), row.status) << row.command;
@@ -104,7 +102,7 @@ TEST(RunCommand, ClosedStandardDescriptorsAreTheNullDevice)
 // A caller that ignores SIGCHLD never waits: a child that ends while a command runs must not remain a zombie.
 TEST(RunCommand, LeavesNoZombieWhenSigchldIsIgnored)
 {
-    const ChildAction ignore(SIG_IGN, 0);
+    const test::ChildAction ignore(SIG_IGN, 0);
     const pid_t other = ::fork();
     if (other == 0) {
         ::usleep(50000);
@@ -141,13 +139,13 @@ TEST(RunCommand, FixedPathAndLocaleAndNothingInherited)
 
 TEST(RunCommand, ThousandRunsLeakNothing)
 {
-    const int before = OpenDescriptors();
+    const int before = test::OpenDescriptors();
     for (int i = 0; i < 334; ++i) {
         RunCommand("exit 1");
         StatusOf("echo x; exit 1");
         CommandOutput unread("yes");
     }
-    EXPECT_EQ(OpenDescriptors(), before);
+    EXPECT_EQ(test::OpenDescriptors(), before);
     EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1);
     EXPECT_EQ(errno, ECHILD);
 }

@@ -4,7 +4,6 @@
 #include "core/detail/command_output.h"
 #include "support/test.h"
 
-using tavo::ComposedPiece;
 using tavo::ShellCommand;
 
 namespace {
@@ -16,9 +15,9 @@ TEST(ShellCommand, PlainArgumentsAreUnchanged)
         "/sbin/sfdisk -N3 -uS -q -f -j63 -z-1 -tfd -F /dev/sda >/dev/null 2>&1");
     EXPECT_EQ(ShellCommand("/sbin/lvcreate %s -n %s -l100%%VG", std::string("vg1"), std::string_view("lv_1@a+b=c:d,e")),
               "/sbin/lvcreate vg1 -n lv_1@a+b=c:d,e -l100%VG");
-    EXPECT_EQ(
-        ShellCommand("mdadm -C %s %s %d %s", "/dev/md2", ComposedPiece{"-pls -c64"}, -1, ComposedPiece{"a 'b c'"}),
-        "mdadm -C /dev/md2 -pls -c64 -1 a 'b c'");
+    EXPECT_EQ(ShellCommand("mdadm -C %s %s %d %s", "/dev/md2", tavo::ComposedPiece{"-pls -c64"}, -1,
+                           tavo::ComposedPiece{"a 'b c'"}),
+              "mdadm -C /dev/md2 -pls -c64 -1 a 'b c'");
 }
 
 // Each argument must come out of the shell unchanged and alone, also within the format's own quotes.

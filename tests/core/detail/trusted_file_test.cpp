@@ -3,11 +3,6 @@
 
 #include "support/test.h"
 
-using testing::ElementsAre;
-using testing::IsEmpty;
-using testing::SizeIs;
-using testing::StartsWith;
-
 namespace {
 
 constexpr uid_t kSomebody = 1000;
@@ -70,7 +65,7 @@ TEST_F(TrustedFile, OpensOnlyOurOwnFilesInPublicFolders)
             ASSERT_EQ(::remove(name_.c_str()), 0);
         }
     }
-    EXPECT_THAT(dir_.Names(), ElementsAre("public", "victim")) << "nothing is made through a link";
+    EXPECT_THAT(dir_.Names(), testing::ElementsAre("public", "victim")) << "nothing is made through a link";
 }
 
 TEST_F(TrustedFile, FollowsLinksAndOpensDevicesElsewhere)
@@ -82,7 +77,7 @@ TEST_F(TrustedFile, FollowsLinksAndOpensDevicesElsewhere)
     EXPECT_TRUE(tavo::OpenTrusted("/dev/null", O_WRONLY));
     EXPECT_FALSE(tavo::OpenTrustedRegular("/dev/null", O_WRONLY));
     EXPECT_TRUE(tavo::OpenTrusted(dangling.c_str(), O_WRONLY | O_CREAT));
-    EXPECT_THAT(dir_.Names(), ElementsAre("dangling", "link", "made", "public", "victim"));
+    EXPECT_THAT(dir_.Names(), testing::ElementsAre("dangling", "link", "made", "public", "victim"));
 }
 
 TEST_F(TrustedFile, ModesDoNotDependOnTheUmask)
@@ -132,11 +127,11 @@ TEST_F(TrustedFile, MovesForeignFilesAside)
         ::lstat(name_.c_str(), &before);
         const std::string aside = tavo::MoveForeignAside(name_);
         if (!row.foreign) {
-            EXPECT_THAT(aside, IsEmpty()) << row.what;
+            EXPECT_THAT(aside, testing::IsEmpty()) << row.what;
             ::remove(name_.c_str());
             continue;
         }
-        EXPECT_THAT(aside, StartsWith(name_ + ".foreign-")) << row.what;
+        EXPECT_THAT(aside, testing::StartsWith(name_ + ".foreign-")) << row.what;
         EXPECT_NE(::lstat(name_.c_str(), &after), 0) << row.what;
         ASSERT_EQ(::lstat(aside.c_str(), &after), 0) << row.what;
         EXPECT_EQ(after.st_ino, before.st_ino) << row.what;

@@ -4,15 +4,12 @@
 #include "support/test.h"
 #include "support/text_lines.h"
 
-using test::Fault;
-using test::LastFault;
-
 namespace {
 
 TEST(ErrorState, CodeAndSourceGoTogether)
 {
     TLIBErrSetEx(ERR_BAD_PARAMETERS, "x", 7);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "x", 7}));
+    EXPECT_EQ(test::LastFault(), (test::Fault{ERR_BAD_PARAMETERS, "x", 7}));
     EXPECT_EQ(tavoerrno, 0x0D00);
 
     TLIBErrSet(ERR_OPEN_FAILED);

@@ -6,9 +6,6 @@
 
 #include <dlfcn.h>
 
-using test::Fault;
-using test::LastFault;
-
 namespace {
 
 constexpr const char *kSettings = "/etc/tavoinfo.conf";
@@ -49,9 +46,9 @@ TEST(SystemSettings, AreLeftAloneWithoutTheLock)
     EXPECT_EQ(rgslckList[0].nRef, 1);
     EXPECT_EQ(ErrTLIBFileUnlock(TAVO_LOCK_TAVOINFO), 0);
     EXPECT_EQ(TAVOINFOSetKeyValue("#runsamba", "yes"), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_set_key_value"}));
+    EXPECT_EQ(test::LastFault(), (test::Fault{ERR_BAD_PARAMETERS, "file_set_key_value"}));
     EXPECT_EQ(TAVOINFOSetKeyValue(nullptr, "yes"), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "info_set_key_value"}));
+    EXPECT_EQ(test::LastFault(), (test::Fault{ERR_BAD_PARAMETERS, "info_set_key_value"}));
     EXPECT_EQ(rgslckList[0].pfLock, nullptr);
     EXPECT_EQ(test::ReadFile(kSettings), "runsamba=no\n");
 }

@@ -6,7 +6,6 @@
 using test::Fault;
 using test::ForgetFault;
 using test::LastFault;
-using testing::ElementsAre;
 
 using namespace std::string_literals;
 
@@ -103,7 +102,7 @@ TEST_F(KeyValueTest, SetReplacesTheFirstAndDropsTheRest)
         EXPECT_EQ(TLIBFileSetKeyValue(file_.c_str(), row.key, row.value, row.format), 1) << row.before;
         EXPECT_EQ(Text(), row.after);
     }
-    EXPECT_THAT(dir_.Names(), ElementsAre("settings.conf"));
+    EXPECT_THAT(dir_.Names(), testing::ElementsAre("settings.conf"));
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
 }
 
@@ -128,7 +127,7 @@ TEST_F(KeyValueTest, SetAndAppendCreateAMissingFile)
     struct stat st;
     ASSERT_EQ(::stat((dir_ / "set").c_str(), &st), 0);
     EXPECT_EQ(st.st_mode & 07777, 0644u);
-    EXPECT_THAT(dir_.Names(), ElementsAre("append", "set"));
+    EXPECT_THAT(dir_.Names(), testing::ElementsAre("append", "set"));
 }
 
 TEST_F(KeyValueTest, WritersRefuseUnreadableValues)

@@ -4,14 +4,10 @@
 #include "support/owned_container.h"
 #include "support/test.h"
 
-using test::Fault;
 using test::HashOf;
-using test::LastFault;
-using test::ListOf;
 using test::Owned;
 using test::PairMap;
 using test::Pairs;
-using testing::ElementsAre;
 
 namespace {
 
@@ -33,14 +29,14 @@ TEST_F(KeysTest, WithoutWantedKeysTheLastLineCounts)
     EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), nullptr, hash, "="), 5);
     EXPECT_EQ(Pairs(hash), (PairMap{{"kept", "yes"}, {"a", "3"}, {"b", "two words"}, {"c", "4"}, {"d", "5"}}));
     Owned<TLIBSZHASH> same = HashOf({});
-    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), ListOf({}), same, "="), 4);
+    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), test::ListOf({}), same, "="), 4);
 }
 
 TEST_F(KeysTest, OfWantedKeysTheFirstLineCounts)
 {
     test::WriteFile(file_, kText);
     Owned<TLIBSZHASH> hash = HashOf({});
-    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), ListOf({"d", "a", "a", "absent", "empty"}), hash, "="), 2);
+    EXPECT_EQ(TLIBFileGetKeys(file_.c_str(), test::ListOf({"d", "a", "a", "absent", "empty"}), hash, "="), 2);
     EXPECT_EQ(Pairs(hash), (PairMap{{"a", "1"}, {"d", "5"}}));
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
 }
@@ -58,7 +54,7 @@ TEST_F(KeysTest, GetRefuses)
     Owned<TLIBSZHASH> hash = HashOf({});
     test::WriteFile(file_, kText);
     EXPECT_EQ(TLIBFileGetKeys((dir_ / "missing").c_str(), nullptr, hash, "="), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "file_get_keys"}));
+    EXPECT_EQ(test::LastFault(), (test::Fault{ERR_OPEN_FAILED, "file_get_keys"}));
     EXPECT_EQ(Pairs(hash), PairMap{});
 }
 
@@ -74,7 +70,7 @@ TEST_F(KeysTest, SetsEveryPairInOneRewrite)
     Owned<TLIBSZHASH> read = HashOf({});
     EXPECT_EQ(TLIBFileGetKeys((dir_ / "made").c_str(), nullptr, read, ":"), 3);
     EXPECT_EQ(Pairs(read), pairs);
-    EXPECT_THAT(dir_.Names(), ElementsAre("made", "settings.conf"));
+    EXPECT_THAT(dir_.Names(), testing::ElementsAre("made", "settings.conf"));
 }
 
 // 16 keys of 22 characters fill the first list of keys to its last byte.
@@ -113,7 +109,7 @@ TEST_F(KeysTest, SetRefusesAndLogsTheLine)
         log_.Clear();
         Owned<TLIBSZHASH> hash = HashOf(row.pairs);
         EXPECT_EQ(TLIBFileSetKeys(file_.c_str(), hash, row.format), -1);
-        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "file_set_keys"}));
+        EXPECT_EQ(test::LastFault(), (test::Fault{ERR_BAD_PARAMETERS, "file_set_keys"}));
         ASSERT_EQ(log_.Texts().size(), 1u);
         EXPECT_THAT(log_.Texts()[0], testing::MatchesRegex("file_set_keys:[0-9]+ .*"));
         EXPECT_THAT(log_.Texts()[0], testing::EndsWith(row.logged));

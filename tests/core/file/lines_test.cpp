@@ -6,7 +6,6 @@
 
 using test::Fault;
 using test::LastFault;
-using testing::ElementsAre;
 
 namespace {
 
@@ -86,7 +85,7 @@ TEST_F(LinesTest, EditsALine)
     check([&] { return TLIBFileReplaceSubStr(path_, "absent", "x"); }, 0, before);
     check([&] { return TLIBFileComment(path_, "key"); }, 1, "one\n;key=1\n;key=2\nend");
     check([&] { return TLIBFileComment(path_, "one"); }, 0, before, ERR_KEY_NOT_FOUND);
-    EXPECT_THAT(dir_.Names(), ElementsAre("file"));
+    EXPECT_THAT(dir_.Names(), testing::ElementsAre("file"));
 
     const std::string missing = dir_ / "missing";
     EXPECT_EQ(TLIBFileAddLine(missing.c_str(), 0, "x"), -1);
@@ -104,7 +103,7 @@ TEST_F(LinesTest, ReadsEveryLineIntoAList)
     test::WriteFile(file_, "one\n\n" + std::string(5000, 'x') + "\nend");
     test::Owned<TLIBSZLIST> list = test::ListOf({"held before"});
     EXPECT_EQ(TLIBFileReadLines(path_, list), 5);
-    EXPECT_THAT(test::Items(list), ElementsAre("held before", "one", "", std::string(5000, 'x'), "end"));
+    EXPECT_THAT(test::Items(list), testing::ElementsAre("held before", "one", "", std::string(5000, 'x'), "end"));
 }
 
 TEST_F(LinesTest, StripsAByteOrderMark)

@@ -7,14 +7,11 @@
 
 #include <climits>
 
-using test::Fault;
 using test::Hash;
-using test::LastFault;
 using test::MakeHash;
 using test::Moving;
 using test::PairMap;
 using test::Pairs;
-using testing::ElementsAre;
 
 namespace {
 
@@ -141,7 +138,7 @@ TEST(HashEnumKey, ListsInSlotOrder)
     const Hash hash = MakeHash({{"c", "3"}, {"a", "1"}, {"B", "2"}, {"", "0"}});
     test::List list = test::MakeList({"first"});
     EXPECT_EQ(Moving(list, [&](auto **addr) { return TLIBSzHashEnumKey(hash.get(), addr); }), 4);
-    EXPECT_THAT(test::Items(list.get()), ElementsAre("first", "", "B", "a", "c"));
+    EXPECT_THAT(test::Items(list.get()), testing::ElementsAre("first", "", "B", "a", "c"));
     EXPECT_EQ(TLIBSzHashEnumKey(hash.get(), nullptr), 4);
     EXPECT_EQ(TLIBSzHashGetLength(hash.get()), 4);
 }
@@ -247,7 +244,7 @@ TEST(Hash, RefusesWithOrWithoutACode)
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS) << "none of these records a code";
 
     EXPECT_EQ(TLIBSzHashEnumKey(addr, &no_list), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "list_insert", 131}));
+    EXPECT_EQ(test::LastFault(), (test::Fault{ERR_BAD_PARAMETERS, "list_insert", 131}));
     EXPECT_EQ(Pairs(hash.get()), (PairMap{{"k", "v"}}));
 }
 

@@ -6,27 +6,24 @@
 
 #include <climits>
 
-using test::Fault;
 using test::Items;
 using test::LastFault;
 using test::List;
 using test::MakeList;
-using test::Moving;
 using testing::ElementsAre;
-using testing::IsEmpty;
 using Texts = std::vector<std::string>;
 
 namespace {
 
 int Insert(List &list, int i, const char *text)
 {
-    return Moving(list, [&](auto **addr) { return TLIBSzListInsert(addr, i, text); });
+    return test::Moving(list, [&](auto **addr) { return TLIBSzListInsert(addr, i, text); });
 }
 
 struct Refusal {
     const char *name;
     std::function<bool()> call;  // true: the function returned its failure value
-    Fault fault = {};
+    test::Fault fault = {};
 };
 #define INT(call)                                                                                                      \
 #call, [&] {                                                                                                       \
@@ -263,7 +260,7 @@ TEST(ListSets, OfAListWithItself)
         list.reset(addr);
         EXPECT_EQ(Items(list.get()), texts);
         EXPECT_EQ(PslTLIBSzListSub(list.get(), list.get(), 0), list.get());
-        EXPECT_THAT(Items(list.get()), IsEmpty());
+        EXPECT_THAT(Items(list.get()), testing::IsEmpty());
     }
 }
 
@@ -329,7 +326,7 @@ TEST(ListDump2Str, JoinsWithinTheBuffer)
         expected.replace(0, std::strlen(row.text), row.text);
         EXPECT_EQ(std::string(buffer, static_cast<size_t>(row.size)), expected) << "the rest is cleared";
         EXPECT_EQ(buffer[row.size], '#');
-        EXPECT_EQ(LastFault(), row.result < 0 ? (Fault{ERR_TRUNCATED, "list_dump_2_str", 50}) : Fault{});
+        EXPECT_EQ(LastFault(), row.result < 0 ? (test::Fault{ERR_TRUNCATED, "list_dump_2_str", 50}) : test::Fault{});
     }
 }
 
@@ -378,7 +375,7 @@ TEST(List, RefusesAndChangesNothing)
         log.Clear();
         EXPECT_TRUE(row.call()) << row.name;
         EXPECT_EQ(LastFault(), row.fault) << row.name;
-        EXPECT_THAT(log.Texts(), IsEmpty());
+        EXPECT_THAT(log.Texts(), testing::IsEmpty());
         EXPECT_EQ(addr, list.get());
         for (const List *untouched : {&list, &sorted, &folded})
             ASSERT_THAT(Items(untouched->get()), ElementsAre("a", "b")) << row.name;

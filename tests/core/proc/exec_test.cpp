@@ -12,7 +12,6 @@
 #include <sys/resource.h>
 #include <sys/syscall.h>
 
-using test::ChildAction;
 using test::Fault;
 using test::LastFault;
 
@@ -278,7 +277,7 @@ TEST(Exec, ReturnsTheStatusForEverySigchldSetting)
         int flags;
     } rows[] = {{SIG_IGN, 0}, {SIG_DFL, SA_NOCLDWAIT}, {OnChild, SA_NOCLDWAIT | SA_RESTART}, {OnChild, 0}};
     for (const auto &row : rows) {
-        const ChildAction set(row.handler, row.flags);
+        const test::ChildAction set(row.handler, row.flags);
         EXPECT_EQ(RunShell("exit 4"), 4);
         EXPECT_EQ(RunVector("/bin/sh", {"sh", "-c", "exit 4"}), 4);
         struct sigaction left;

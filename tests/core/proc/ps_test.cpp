@@ -10,9 +10,6 @@
 #include <sys/mman.h>
 #include <sys/syscall.h>
 
-using test::Fault;
-using test::LastFault;
-
 namespace {
 
 // The shell's last command; other processes write it.
@@ -138,7 +135,7 @@ TEST_F(Ps, HostilePatterns)
 TEST_F(Ps, Refuses)
 {
     EXPECT_EQ(TLIBPs(std::string(1025, 'x').c_str(), nullptr, 0), -1) << "grep would take minutes for a longer one";
-    EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "ps"}));
+    EXPECT_EQ(test::LastFault(), (test::Fault{ERR_BAD_PARAMETERS, "ps"}));
     EXPECT_EQ(TLIBPs(std::string(1024, 'x').c_str(), nullptr, 0), 0);
 }
 

@@ -12,8 +12,6 @@
 #include <sys/syscall.h>
 #include <syslog.h>
 
-using test::ChildAction;
-using test::Fault;
 using test::LastFault;
 using namespace std::chrono_literals;
 
@@ -34,7 +32,7 @@ extern "C" int kill(pid_t pid, int signal) noexcept
 
 namespace {
 
-const Fault kExpired = {ERR_TIMER_EXPIRED, "proc_timed_exec"};
+const test::Fault kExpired = {ERR_TIMER_EXPIRED, "proc_timed_exec"};
 
 std::chrono::milliseconds TimeOf(const std::function<void()> &what)
 {
@@ -74,7 +72,7 @@ TEST(TimedExec, Refuses)
         log.Clear();
         test::ForgetFault();
         EXPECT_EQ(TLIBTimedExec(row.seconds, row.program, NULL), -1);
-        EXPECT_EQ(LastFault(), (Fault{ERR_BAD_PARAMETERS, "proc_timed_exec"}));
+        EXPECT_EQ(LastFault(), (test::Fault{ERR_BAD_PARAMETERS, "proc_timed_exec"}));
         ASSERT_EQ(log.Lines().size(), 1u);
         EXPECT_EQ(log.Lines()[0].priority, LOG_ERR);
         EXPECT_THAT(log.Lines()[0].text, testing::MatchesRegex("proc_timed_exec:[0-9]+ Invaild Argument \\(" +
@@ -89,7 +87,7 @@ TEST(TimedExec, StatusIsTheResult)
     EXPECT_EQ(TLIBTimedExec(60, "/nonexistent", NULL), 255);
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
     EXPECT_EQ(TLIBTimedExec(60, "/bin/sh", "-c", "kill -KILL $$", NULL), -1);
-    EXPECT_EQ(LastFault(), (Fault{ERR_OP_FAILURE, "proc_timed_exec"}));
+    EXPECT_EQ(LastFault(), (test::Fault{ERR_OP_FAILURE, "proc_timed_exec"}));
     EXPECT_EQ(TLIBTimedExec(INT_MAX, "/bin/true", NULL), 0);
     EXPECT_EQ(TLIBTimedExec(60, "/bin/sh", "-c", "exit $#", "0", "1", "2", "3", "4", "5", "6", "7", "8", "9", "10",
                             "11", "12", "13", "14", "15", "16", "17", "18", "19", "20", "21", "22", "23", "24", "25",
@@ -123,8 +121,8 @@ TEST(TimedExec, TheLimitIsExact)
         test::ForgetFault();
         int result = -2;
         const auto time = TimeOf([&] { result = TLIBTimedExec(1, "/bin/sleep", one.program, NULL); });
-        return result == one.result && LastFault() == (result == -1 ? kExpired : Fault{}) && time >= one.earliest &&
-               time <= one.latest;
+        return result == one.result && LastFault() == (result == -1 ? kExpired : test::Fault{}) &&
+               time >= one.earliest && time <= one.latest;
     };
     struct Run {
         std::string what;
@@ -189,7 +187,7 @@ bool LeavesZombie()
 TEST(TimedExec, TheHandlerStaysWithoutZombiesWhenSigchldIsIgnored)
 {
     if (test::InChild([] {
-            const ChildAction kernel_collects(SIG_DFL, SA_NOCLDWAIT);
+            const test::ChildAction kernel_collects(SIG_DFL, SA_NOCLDWAIT);
             return LeavesZombie() ? 1 : 0;
         }) != 0)
         GTEST_SKIP() << "this emulator knows no SA_NOCLDWAIT";

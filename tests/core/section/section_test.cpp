@@ -8,10 +8,8 @@ using test::Fault;
 using test::HashOf;
 using test::LastFault;
 using test::Owned;
-using test::PairMap;
 using test::Pairs;
 using test::Settings;
-using testing::ElementsAre;
 
 namespace {
 
@@ -54,7 +52,7 @@ TEST_F(SectionTest, ReadsTheFirstSectionOfAName)
                            "e=x=y\n[broken\nlost=1\n[net]\na=second\n");
     Owned<TLIBSZHASH> hash = HashOf({{"kept", "yes"}});
     EXPECT_EQ(TLIBFileGetSection(path_, "net", hash), 5);
-    EXPECT_EQ(Pairs(hash), (PairMap{{"kept", "yes"}, {"a", "1 2"}, {"b", "2"}, {"empty", ""}, {"e", "x=y"}}));
+    EXPECT_EQ(Pairs(hash), (test::PairMap{{"kept", "yes"}, {"a", "1 2"}, {"b", "2"}, {"empty", ""}, {"e", "x=y"}}));
     Owned<TLIBSZHASH> none = HashOf({});
     EXPECT_EQ(TLIBFileGetSection(path_, "absent", none), 0);
     EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
@@ -68,7 +66,7 @@ TEST_F(SectionTest, ListsSections)
     test::WriteFile(file_, "[a]\nx=1\n[ b ] \n[broken\n[]\n[c]d]\n" + ("[" + std::string(1020, 'n') + "]\n"));
     Owned<TLIBSZLIST> list = test::ListOf({"held before"});
     EXPECT_EQ(TLIBFileEnumSection(path_, list), 6);
-    EXPECT_THAT(test::Items(list), ElementsAre("held before", "a", " b ", "", "c]d", std::string(1020, 'n')));
+    EXPECT_THAT(test::Items(list), testing::ElementsAre("held before", "a", " b ", "", "c]d", std::string(1020, 'n')));
 
     TLIBSzListRemoveAll(list);
     test::WriteFile(file_, "[a]\n[" + std::string(1021, 'n') + "]\n[b]\n");
@@ -93,7 +91,7 @@ TEST_F(SectionTest, SetReplacesEverySectionOfTheName)
 
     EXPECT_EQ(ErrTLIBFileSetSection(path_, "other", "renamed", HashOf({{"x", "y"}}), 1, "%s = \"%s\"%%\n"), 1);
     EXPECT_THAT(test::ReadFile(file_), testing::HasSubstr("# stays\n[renamed]\nx = \"y\"%\n[net]\n"));
-    EXPECT_THAT(dir_.Names(), ElementsAre("file"));
+    EXPECT_THAT(dir_.Names(), testing::ElementsAre("file"));
 }
 
 TEST_F(SectionTest, RemoveLeavesTheComments)
@@ -122,7 +120,7 @@ TEST_F(SectionTest, SetRefuses)
     const Owned<TLIBSZHASH> hash = HashOf({{"a", "1"}});
     struct Row {
         const char *new_name;
-        PairMap pairs;
+        test::PairMap pairs;
         const char *format;
         Fault fault;
     };
@@ -144,7 +142,7 @@ TEST_F(SectionTest, SetRefuses)
     EXPECT_EQ(ErrTLIBFileRemoveSection((dir_ / "missing").c_str(), "net"), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "file_modify_section"}));
     EXPECT_EQ(test::ReadFile(file_), kText);
-    EXPECT_THAT(dir_.Names(), ElementsAre("file"));
+    EXPECT_THAT(dir_.Names(), testing::ElementsAre("file"));
 }
 
 TEST_F(SectionTest, AddAppends)

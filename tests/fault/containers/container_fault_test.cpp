@@ -9,8 +9,6 @@
 #include "support/owned_container.h"
 #include "support/test.h"
 
-using test::Fault;
-using test::Hash;
 using test::List;
 
 namespace {
@@ -22,8 +20,8 @@ struct World {
     List list = test::MakeList({"b", "a", "c"});
     List other = test::MakeList({"c", "d", kLarge});
     List sorted = test::MakeList({"c", "d"}, TLIB_SZLIST_SORTED);
-    Hash hash = test::MakeHash({{"key", "value"}}, 64);
-    Hash wide = test::MakeHash({{kLarge, "value"}}, 64);  // its key does not fit into the list
+    test::Hash hash = test::MakeHash({{"key", "value"}}, 64);
+    test::Hash wide = test::MakeHash({{kLarge, "value"}}, 64);  // its key does not fit into the list
     char buffer[16] = "#";
 
     auto Contents() const
@@ -48,7 +46,7 @@ bool Replaces(Owner &owner, Block *moved)
 struct Row {
     const char *name;
     bool (*call)(World &);  // true: it has succeeded
-    Fault fault = {};
+    test::Fault fault = {};
     int allocations = 1;
 };
 
@@ -83,7 +81,7 @@ const Row kRows[] = {
      3},
     {IS((TLIBSzListSortItems(w.list.get(), 16), true)), {}, 0},
     {IS(TLIBSzListCaseFind(w.list.get(), "C") >= 0), {}, 0},
-    {IS(Hash(PshTLIBSzHashAlloc(100)) != nullptr), {0x0200, "hash_allocator", 39}},
+    {IS(test::Hash(PshTLIBSzHashAlloc(100)) != nullptr), {0x0200, "hash_allocator", 39}},
     {MOVES(hash, TLIBSzHashSetValue(a, "another", kLarge.c_str()))},
     {MOVES(hash, TLIBSzHashSetValue(a, "key", kLarge.c_str()))},
     {IS(Replaces(w.hash, PshTLIBIReSizeHash(w.hash.get(), 50, 500)))},
@@ -109,7 +107,7 @@ TEST(ContainerFault, ReportsEachRefusedAllocationAndChangesNothing)
             const bool succeeded = row.call(world);
             faults.Disarm();
             EXPECT_EQ(succeeded, !faults.Fired());
-            EXPECT_EQ(test::LastFault(), faults.Fired() ? row.fault : Fault{});
+            EXPECT_EQ(test::LastFault(), faults.Fired() ? row.fault : test::Fault{});
             if (faults.Fired()) {
                 EXPECT_EQ(faults.LeftAllocated(), 0);
                 EXPECT_EQ(world.Contents(), before);

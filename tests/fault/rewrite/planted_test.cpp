@@ -6,8 +6,6 @@
 
 #include <sys/file.h>
 
-using testing::ElementsAre;
-
 namespace {
 
 using test::kScratch;
@@ -43,7 +41,7 @@ class Planted : public testing::Test {
         EXPECT_EQ(TLIBFileComment(file_.c_str(), "key"), 1) << what;
         EXPECT_EQ(test::ReadFile(file_), "a=1\n;key=1\n") << what;
         EXPECT_EQ(test::ReadFile(victim_), "precious\n") << what;
-        EXPECT_THAT(dir_.Names(), ElementsAre("file", "victim")) << what;
+        EXPECT_THAT(dir_.Names(), testing::ElementsAre("file", "victim")) << what;
     }
 
     const test::ScratchDir dir_;
@@ -144,7 +142,7 @@ TEST_F(Planted, TrapsInAPublicDirectoryAreNotOpened)
         EXPECT_GT(test::ReadFile(file_).size(), text.size()) << writer.name;
         text = test::ReadFile(file_);
     }
-    EXPECT_THAT(dir_.Names(), ElementsAre("file", "link", "open", "victim"));
+    EXPECT_THAT(dir_.Names(), testing::ElementsAre("file", "link", "open", "victim"));
 }
 
 TEST_F(Planted, RefusesSpecialFilesAtOnce)
@@ -172,7 +170,7 @@ TEST_F(Planted, RefusesSpecialFilesAtOnce)
               TLIBFileEnumSection(at, list), TLIBFileGetLine(at, 1, nullptr, 0), TLIBFileTouch(at)})
             EXPECT_EQ(result, -1) << path;
     }
-    EXPECT_THAT(dir_.Names(), ElementsAre("fifo", "file", "victim"));
+    EXPECT_THAT(dir_.Names(), testing::ElementsAre("fifo", "file", "victim"));
 }
 
 }  // namespace

@@ -21,11 +21,8 @@ using test::Lines;
 using test::Node;
 using test::ReadFile;
 using test::ShellStatus;
-using test::VirtualCable;
-using test::WriteFile;
 using testing::HasSubstr;
 using testing::UnorderedElementsAre;
-using testing::UnorderedElementsAreArray;
 
 namespace {
 
@@ -68,7 +65,7 @@ class Daemons : public testing::Test {
   protected:
     void SetUp() override
     {
-        if (const std::string missing = VirtualCable::Missing(); !missing.empty())
+        if (const std::string missing = test::VirtualCable::Missing(); !missing.empty())
             GTEST_SKIP() << missing;
         if (test::RootLacks("uids"))
             GTEST_SKIP() << "the daemon has nobody to become";
@@ -86,12 +83,7 @@ class Daemons : public testing::Test {
             ASSERT_EQ(node->Shell(kDaemon), 0);
     }
 
-    static void On(const Node &node, const std::function<void()> &body)
-    {
-        EXPECT_TRUE(node.Run([&] { return body(), true; }));
-    }
-
-    std::optional<VirtualCable> cable_;
+    std::optional<test::VirtualCable> cable_;
     std::optional<Node> nodes_[3];
 };
 
@@ -99,19 +91,19 @@ TEST_F(Daemons, FindEachOther)
 {
     for (int i = 1; i < 3; ++i)
         ASSERT_EQ(nodes_[i]->Shell(kDaemon), 0);
-    On(*nodes_[0], [] {
+    nodes_[0]->Do([] {
         EXPECT_THAT(Discover(2), UnorderedElementsAre("nas2(192.0.2.2)", "nas3(192.0.2.3)"));
         EXPECT_FALSE(std::filesystem::exists(kList)) << "taken";
         EXPECT_GT(TLIBReadPidFile(kPidFile), 0) << "the library started it";
     });
     // And the others that one, by now; once more and a second time, since each query begins a new list.
     for (int round = 0; round < 2; ++round)
-        On(*nodes_[1], [] { EXPECT_THAT(Discover(2), UnorderedElementsAre("nas1(192.0.2.1)", "nas3(192.0.2.3)")); });
+        nodes_[1]->Do([] { EXPECT_THAT(Discover(2), UnorderedElementsAre("nas1(192.0.2.1)", "nas3(192.0.2.3)")); });
     // A new name, and one that is switched off, are known once the last answers are old.
     ASSERT_TRUE(nodes_[0]->Run([] { return ::sethostname("attic", 5) == 0; }));
     ASSERT_EQ(nodes_[2]->Shell("ifconfig eth0 down"), 0);
     ::usleep(15500000);
-    On(*nodes_[1], [] {
+    nodes_[1]->Do([] {
         std::filesystem::remove(kList);
         EXPECT_THAT(Discover(1), UnorderedElementsAre("attic(192.0.2.1)"));
     });
@@ -123,17 +115,17 @@ TEST_F(Daemons, AreFoundByABoxWithTwoPorts)
     StartAll();
     Node asker("asker");
     ASSERT_EQ(asker.Shell("rm -f /etc/sysconfig/network-scripts/*"), 0);
-    VirtualCable second("second");
+    test::VirtualCable second("second");
     cable_->Plug(asker, "eth0");
     second.Plug(asker, "eth1");
     const std::vector<std::string> all = {"nas1(192.0.2.1)", "nas2(192.0.2.2)", "nas3(192.0.2.3)"};
     const auto found = [&](const char *cables, const std::vector<std::string> &expected) {
         ASSERT_EQ(asker.Shell(cables), 0) << cables;
         SCOPED_TRACE(cables);
-        On(asker, [&] {
+        asker.Do([&] {
             EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u);
             int result = -1;
-            EXPECT_THAT(Discover(expected.size(), &result), UnorderedElementsAreArray(expected));
+            EXPECT_THAT(Discover(expected.size(), &result), testing::UnorderedElementsAreArray(expected));
             EXPECT_EQ(result, 0) << "nothing has failed";
         });
     };
@@ -152,7 +144,7 @@ TEST_F(Daemons, AreFoundByABondWithOneLeg)
     Node asker("asker");
     if (asker.Shell("ip link add bond0 type bond 2>/dev/null") != 0)
         GTEST_SKIP() << "this kernel has no bonds";
-    VirtualCable second("second");
+    test::VirtualCable second("second");
     second.Plug(asker, "eth0");
     cable_->Plug(asker, "eth1");
     ASSERT_EQ(asker.Shell("rm -f /etc/sysconfig/network-scripts/* && mount -o remount,rw /sys && "
@@ -161,7 +153,7 @@ TEST_F(Daemons, AreFoundByABondWithOneLeg)
                           "ifconfig bond0 192.0.2.9 netmask 255.255.255.0 up"),
               0);
     ASSERT_EQ(ShellStatus("ip link set second0 down"), 0) << "the cable is cut";
-    On(asker, [] {
+    asker.Do([] {
         EXPECT_TRUE(Eventually([] { return ReadFile("/sys/class/net/bond0/bonding/active_slave") == "eth1\n"; }));
         int result = -1;
         EXPECT_THAT(Discover(3, &result),
@@ -201,7 +193,7 @@ struct Pids {
 TEST_F(Daemons, TheListenerHasNoRights)
 {
     StartAll();
-    On(*nodes_[0], [] {
+    nodes_[0]->Do([] {
         const Pids pids;
         EXPECT_EQ(Status(pids.listener, "Uid"), "65534\t65534\t65534\t65534");
         EXPECT_EQ(Status(pids.listener, "Gid"), "65534\t65534\t65534\t65534");
@@ -229,7 +221,7 @@ TEST_F(Daemons, TheListenerHasNoRights)
 TEST_F(Daemons, OneEndsWithTheOther)
 {
     StartAll();
-    On(*nodes_[0], [] {
+    nodes_[0]->Do([] {
         const std::pair<bool, int> ends[] = {{true, SIGTERM}, {false, SIGKILL}, {true, SIGKILL}};
         for (const auto &[writer, signal] : ends) {
             const Pids pids;
@@ -245,7 +237,7 @@ TEST_F(Daemons, OneEndsWithTheOther)
 // The starting program reads to the end of its output, or has no streams at all.
 TEST_F(Daemons, LeaveTheCallersStreams)
 {
-    On(*nodes_[0], [] {
+    nodes_[0]->Do([] {
         const std::string daemon = kDaemon;
         EXPECT_EQ(ShellStatus("x=$(timeout 20 sh -c '" + daemon + " 2>&1; echo $?'); [ \"$x\" = 0 ]"), 0);
         for (const char *closed : {"0<&-", "1>&-", "2>&-", "0<&- 1>&- 2>&-"}) {
@@ -265,8 +257,8 @@ TEST_F(Daemons, LeaveTheCallersStreams)
 
 TEST_F(Daemons, IgnoreALockOfAnotherProgram)
 {
-    On(*nodes_[0], [] {
-        WriteFile(kPidFile, "1\n");
+    nodes_[0]->Do([] {
+        test::WriteFile(kPidFile, "1\n");
         const int fd = ::open(kPidFile, O_RDONLY | O_CLOEXEC);
         EXPECT_EQ(::flock(fd, LOCK_EX), 0);
         EXPECT_EQ(ShellStatus(kDaemon), 0);
@@ -377,19 +369,19 @@ TEST_F(Daemons, AMillionHostilePacketsChangeNothing)
 {
     ASSERT_EQ(nodes_[0]->Shell(kDaemon), 0);
     ASSERT_EQ(nodes_[1]->Shell(kDaemon), 0);
-    On(*nodes_[2], [] {
+    nodes_[2]->Do([] {
         UdpSocket().Send("192.0.2.1", Reply("192.0.2.3", "unasked"));
         ::usleep(300000);
     });
     const int packets = test::Rounds(1000000) / (std::getenv("TAVO_LONG_TESTS") ? 1 : 4);
     long memory = 0;
     for (const unsigned round : {1u, 9u}) {
-        On(*nodes_[0], [] {
+        nodes_[0]->Do([] {
             EXPECT_EQ(ErrFHOSTSendQueryPkt(), 0u);
             EXPECT_TRUE(Eventually([] { return !Lines(ListText()).empty(); }));
         });
-        On(*nodes_[2], [&] { Flood(packets / 10 * static_cast<int>(round), round); });
-        On(*nodes_[0], [] {
+        nodes_[2]->Do([&] { Flood(packets / 10 * static_cast<int>(round), round); });
+        nodes_[0]->Do([] {
             EXPECT_TRUE(Eventually([] { return Lines(ListText()).size() == 2; })) << ListText();
             EXPECT_THAT(Lines(ListText()),
                         UnorderedElementsAre("6,240,nas2,192.0.2.2,eth0", "7,250,mallory,192.0.2.3,eth0"));
@@ -408,7 +400,7 @@ TEST_F(Daemons, AMillionHostilePacketsChangeNothing)
 TEST_F(Daemons, CannotBeUsedToFloodAnotherHost)
 {
     ASSERT_EQ(nodes_[0]->Shell(kDaemon), 0);
-    On(*nodes_[1], [&] {
+    nodes_[1]->Do([&] {
         const UdpSocket socket(findhostd::kPort);
         socket.Send("192.0.2.1", kQuery);
         EXPECT_EQ(socket.Count(), 1u);
@@ -420,7 +412,7 @@ TEST_F(Daemons, CannotBeUsedToFloodAnotherHost)
         for (int i = 0; i < 2000; ++i)
             socket.Send("192.0.2.1", kQuery);
     });
-    On(*nodes_[2], [] {
+    nodes_[2]->Do([] {
         const UdpSocket socket(findhostd::kPort);
         ::usleep(50000);  // the flood has been read
         socket.Send("192.0.2.1", kQuery);
@@ -429,7 +421,7 @@ TEST_F(Daemons, CannotBeUsedToFloodAnotherHost)
     // An asker whose address is not of this network.
     ASSERT_EQ(nodes_[2]->Shell("ifconfig eth0 198.51.100.3 netmask 255.255.255.0 && route add default dev eth0"), 0);
     ASSERT_EQ(nodes_[0]->Shell("route add default dev eth0"), 0);
-    On(*nodes_[2], [&] {
+    nodes_[2]->Do([&] {
         const UdpSocket socket(findhostd::kPort);
         socket.Send("192.0.2.1", kQuery);
         EXPECT_EQ(socket.Count(), 0u);
@@ -440,7 +432,7 @@ TEST_F(Daemons, CannotBeUsedToFloodAnotherHost)
 TEST_F(Daemons, ALocalQueryEmptiesNoList)
 {
     StartAll();
-    On(*nodes_[0], [] {
+    nodes_[0]->Do([] {
         ExpectAnswers(2);
         const UdpSocket socket;
         std::set<ino_t> lists;
@@ -457,12 +449,12 @@ TEST_F(Daemons, ALocalQueryEmptiesNoList)
         EXPECT_LE(double(lists.size()), 4 * taken.count() + 4) << "four a second";
     });
     // The other two: a later answer in the same collection does not rename a host.
-    On(*nodes_[1], [] { UdpSocket().Send("192.0.2.1", Reply("192.0.2.2", "forged")); });
+    nodes_[1]->Do([] { UdpSocket().Send("192.0.2.1", Reply("192.0.2.2", "forged")); });
     // And one that is not of the interface's network is none.
     ASSERT_EQ(nodes_[2]->Shell("ifconfig eth0 198.51.100.3 netmask 255.255.255.0 && route add default dev eth0"), 0);
-    On(*nodes_[2], [] { UdpSocket().Send("192.0.2.1", Reply("198.51.100.3", "foreign")); });
+    nodes_[2]->Do([] { UdpSocket().Send("192.0.2.1", Reply("198.51.100.3", "foreign")); });
     ::usleep(600000);
-    On(*nodes_[0], [] {
+    nodes_[0]->Do([] {
         EXPECT_THAT(Lines(ListText()), UnorderedElementsAre("6,240,nas2,192.0.2.2,eth0", "6,240,nas3,192.0.2.3,eth0"));
     });
 }
@@ -470,8 +462,8 @@ TEST_F(Daemons, ALocalQueryEmptiesNoList)
 TEST_F(Daemons, ReplaceForeignFilesAtTheListsPath)
 {
     StartAll();
-    On(*nodes_[0], [] {
-        WriteFile("/tmp/victim", "root:x\n");
+    nodes_[0]->Do([] {
+        test::WriteFile("/tmp/victim", "root:x\n");
         std::filesystem::create_symlink("/tmp/victim", kList);
         ExpectAnswers(2);
         EXPECT_FALSE(std::filesystem::is_symlink(kList));

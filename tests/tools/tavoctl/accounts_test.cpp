@@ -13,15 +13,12 @@ namespace {
 
 using nlohmann::json;
 using test::ReadFile;
-using test::ScratchDir;
 using test::Succeeds;
 using test::Tavoctl;
 using test::TavoctlAtTerminal;
 using test::Words;
 using test::WriteFile;
-using testing::AllOf;
 using testing::Contains;
-using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::Not;
 
@@ -141,7 +138,7 @@ TEST_F(TavoctlAccounts, GroupsAreAddedChangedAndRenamed)
     EXPECT_EQ(Line("/etc/group_desc", "Team"), "Team:Us");
     EXPECT_EQ(Shown({"group", "show", "team"}), json::parse(R"({"name": "Team", "kind": "local", "gid": 70000,
         "description": "Us", "members": [], "strangers": []})"));
-    EXPECT_THAT(Shown({"group", "show", "users"}).at("members"), AllOf(Contains("anna"), Contains("admin")));
+    EXPECT_THAT(Shown({"group", "show", "users"}).at("members"), testing::AllOf(Contains("anna"), Contains("admin")));
     Succeeds({"group", "delete", "--yes", "team"});
     EXPECT_EQ(Line(groups, "Team"), "");
 }
@@ -176,9 +173,9 @@ TEST_F(TavoctlAccounts, ReadingVerbsSayTheSameAsTheFiles)
             found.push_back(row.at("name"));
         return found;
     };
-    EXPECT_THAT(names(Shown({"user", "list"})), ElementsAre("admin", "anna", "berta", "guest"));
-    EXPECT_THAT(names(Shown({"user", "list", "--prefix", "A"})), ElementsAre("admin", "anna"));
-    EXPECT_THAT(names(Shown({"user", "list", "--part", "ERT"})), ElementsAre("berta"));
+    EXPECT_THAT(names(Shown({"user", "list"})), testing::ElementsAre("admin", "anna", "berta", "guest"));
+    EXPECT_THAT(names(Shown({"user", "list", "--prefix", "A"})), testing::ElementsAre("admin", "anna"));
+    EXPECT_THAT(names(Shown({"user", "list", "--part", "ERT"})), testing::ElementsAre("berta"));
     const json guest = Shown({"user", "list", "--prefix", "guest"}).at(0);
     EXPECT_EQ(guest.at("expires"), "1970-01-02");
     EXPECT_EQ(guest.at("expired"), true);
@@ -247,7 +244,7 @@ TEST_F(TavoctlAccounts, UsersWhoAreAtWorkAreDeletedByForceOnly)
     EXPECT_TRUE(test::Eventually([&] {
         return (ran = Tavoctl({"user", "delete", "--dry-run", "berta"})).status == 4;
     }));
-    EXPECT_THAT(ran.err, AllOf(HasSubstr("running the process " + std::to_string(pid)), HasSubstr("--force")));
+    EXPECT_THAT(ran.err, testing::AllOf(HasSubstr("running the process " + std::to_string(pid)), HasSubstr("--force")));
     EXPECT_EQ(Tavoctl(remove).status, 4);
     EXPECT_NE(Line(passwd, "anna"), "");
     EXPECT_NE(Line(passwd, "berta"), "");
@@ -295,7 +292,7 @@ TEST_F(TavoctlAccounts, LocksAndAgesOutliveOtherChanges)
     EXPECT_EQ(Fields(samba, "anna2").at(4), "[DU         ]");
     const json user = Shown({"user", "show", "anna2"});
     EXPECT_THAT((std::vector<json>{user.at("min_days"), user.at("max_days"), user.at("warn_days")}),
-                ElementsAre(1, 90, 14));
+                testing::ElementsAre(1, 90, 14));
     EXPECT_EQ(user.at("password"), "locked");
 
     Succeeds({"user", "unlock", "anna2", "berta"});
@@ -364,7 +361,7 @@ TEST_F(TavoctlAccounts, PasswordsAreTypedTwiceAndNeverShown)
 
 TEST_F(TavoctlAccounts, ExportedAccountsComeBackAsTheyWere)
 {
-    const ScratchDir dir;
+    const test::ScratchDir dir;
     Succeeds({"user", "modify", "anna", "--description", "A, \"B\": ' C"});
     for (const bool as_json : {false, true}) {
         Words words = {"user", "export", "--hashes", "--output", dir / (as_json ? "u.json" : "u.csv")};
@@ -402,8 +399,8 @@ TEST_F(TavoctlAccounts, ExportedAccountsComeBackAsTheyWere)
         Succeeds({"group", "delete", "--yes", "staff"});
     }
     // Hashes are only exported on request.
-    EXPECT_THAT(Tavoctl({"user", "export"}).out, AllOf(HasSubstr("anna"), Not(HasSubstr("$1$"))));
-    EXPECT_THAT(Tavoctl({"user", "export", "--json"}).out, AllOf(HasSubstr("anna"), Not(HasSubstr("hash"))));
+    EXPECT_THAT(Tavoctl({"user", "export"}).out, testing::AllOf(HasSubstr("anna"), Not(HasSubstr("$1$"))));
+    EXPECT_THAT(Tavoctl({"user", "export", "--json"}).out, testing::AllOf(HasSubstr("anna"), Not(HasSubstr("hash"))));
 }
 
 // Their controller keeps them: a list with them could not be imported.
@@ -530,7 +527,7 @@ TEST_F(TavoctlAccounts, AListThatIsWrongAnywhereIsRefusedWhole)
     EXPECT_EQ(Tavoctl({"user", "import", "/none"}).status, 3);
 
     // What is not a list of accounts is not read to its end.
-    const ScratchDir dir;
+    const test::ScratchDir dir;
     ASSERT_EQ(::mkfifo((dir / "fifo").c_str(), 0600), 0);
     WriteFile(dir / "large", "name\n");
     ASSERT_EQ(::truncate((dir / "large").c_str(), off_t{1} << 30), 0);

@@ -9,11 +9,9 @@
 namespace {
 
 using nlohmann::json;
-using test::Ran;
 using test::Tavoctl;
 using test::Words;
 using testing::HasSubstr;
-using testing::Not;
 
 json Verbs()
 {
@@ -67,7 +65,7 @@ TEST(TavoctlContract, WithoutRightsAVerbSaysSo)
     for (const json &verb : Verbs()) {
         if (verb.at("family") == "discover" || verb.at("family") == "watch" || HasTrait(verb, "runs_program"))
             continue;  // ten seconds; for ever; a program of the caller's
-        const Ran ran = test::AsNobody([&] { return Tavoctl(CallOf(verb)); });
+        const test::Ran ran = test::AsNobody([&] { return Tavoctl(CallOf(verb)); });
         const bool changes = HasTrait(verb, "changes") && !HasTrait(verb, "by_anybody");
         changing += changes;
         if (changes) {
@@ -91,7 +89,7 @@ TEST(TavoctlContract, AWrongArgumentIsNamedWithWhatIsAllowed)
             if (argument.at("wrong").is_null())
                 continue;
             const std::string value = argument.at("wrong");
-            const Ran ran = Tavoctl(CallOf(verb, argument.at("name"), value));
+            const test::Ran ran = Tavoctl(CallOf(verb, argument.at("name"), value));
             EXPECT_EQ(ran.status, 2) << NameOf(verb) << " " << argument.at("name") << ran;
             EXPECT_THAT(ran.err, HasSubstr("cannot take " + value + " as " + argument.at("name").get<std::string>()))
                 << NameOf(verb);
@@ -128,7 +126,7 @@ TEST(TavoctlContract, MissingObjectsAreNotFound)
         Words words = CallOf(verb);
         if (NameOf(verb) == "user modify" || NameOf(verb) == "group modify")
             words.insert(words.end(), {"--description", "x"});
-        const Ran ran = Tavoctl(words);
+        const test::Ran ran = Tavoctl(words);
         EXPECT_EQ(ran.status, 3) << testing::PrintToString(words) << ran;
         ++asked;
     }
@@ -150,16 +148,20 @@ TEST(TavoctlContract, AHeldLockIsBusy)
     EXPECT_EQ(ErrTLIBFileUnlock(all), 0);
 }
 
-TEST(TavoctlContract, NoHelpTextIsWiderThanATerminal)
+TEST(TavoctlContract, EveryVerbHasHelpWithAnExampleNoWiderThanATerminal)
 {
+    const std::string families = Tavoctl({"--help"}).out;
     for (const json &verb : Verbs()) {
-        const std::string family = verb.at("family");
-        const std::string name = verb.at("verb");
-        const std::string text = Tavoctl(name.empty() ? Words{family, "--help"} : Words{family, name, "--help"}).out +
-                                 Tavoctl({family, "--help"}).out;
-        std::istringstream lines(text.substr(0, text.find("\nExamples:")));
+        const std::string family = verb.at("family"), name = verb.at("verb");
+        const std::string command = "tavoctl " + family + (name.empty() ? "" : " " + name);
+        const test::Ran ran = Tavoctl(name.empty() ? Words{family, "--help"} : Words{family, name, "--help"});
+        EXPECT_EQ(ran.status, 0) << command;
+        EXPECT_THAT(ran.out, AllOf(testing::StartsWith("usage: " + command), HasSubstr("Examples:\n  " + command)));
+        EXPECT_THAT(families, HasSubstr("  " + family + " "));
+        EXPECT_THAT("\n" + Tavoctl({"--complete", family, ""}).out, HasSubstr("\n" + name)) << command;
+        std::istringstream lines(ran.out.substr(0, ran.out.find("\nExamples:")) + Tavoctl({family, "--help"}).out);
         for (std::string line; std::getline(lines, line);)
-            EXPECT_LE(line.size(), 80u) << NameOf(verb) << ": " << line;
+            EXPECT_LE(line.size(), 80u) << command << ": " << line;
     }
 }
 
@@ -175,7 +177,7 @@ TEST(TavoctlContract, LimitedCallersGetAMessage)
     EXPECT_EQ(status("cd /etc && ls -A | cmp - /tmp/names"), 0);
     // A lack of descriptors is not reported as a lock of another program.
     EXPECT_EQ(status("exec >/dev/null 2>/tmp/err; ulimit -n 4; exec tavoctl user list"), 1);
-    EXPECT_THAT(test::ReadFile("/tmp/err"), Not(HasSubstr("another program")));
+    EXPECT_THAT(test::ReadFile("/tmp/err"), testing::Not(HasSubstr("another program")));
 }
 
 }  // namespace

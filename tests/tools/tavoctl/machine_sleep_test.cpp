@@ -5,8 +5,6 @@
 
 namespace {
 
-using test::Shell;
-using test::Succeeds;
 using test::Told;
 
 class MachineSleep : public test::MachineTest {
@@ -36,8 +34,8 @@ std::string Traffic()
 
 TEST_F(MachineSleep, ListsAskSleepingDisksForNothingButTheirPower)
 {
-    Succeeds({"raid", "create", "--yes", "--level", "5", "--no-sync", "md2", "sda", "sdb", "sdc"});
-    Succeeds({"volume", "create", "--yes", "1", "md2"});
+    test::Succeeds({"raid", "create", "--yes", "--level", "5", "--no-sync", "md2", "sda", "sdb", "sdc"});
+    test::Succeeds({"volume", "create", "--yes", "1", "md2"});
     Told("sync; sleep 8; sync");  // what the file system still had to write
     const std::set<std::string> power = {"E5"};
     for (const char *words : {"disk list", "disk list --json", "disk info sda", "disk health", "raid list",
@@ -50,7 +48,7 @@ TEST_F(MachineSleep, ListsAskSleepingDisksForNothingButTheirPower)
         for (int attempt = 0; attempt < 5 && !is_quiet; ++attempt) {
             Told("echo 3 >/proc/sys/vm/drop_caches");
             const std::string before = Traffic();
-            result = Shell(std::string("LD_PRELOAD=" TEST_SLEEPY_DRIVES " timeout 60 tavoctl ") + words);
+            result = test::Shell(std::string("LD_PRELOAD=" TEST_SLEEPY_DRIVES " timeout 60 tavoctl ") + words);
             is_quiet = Traffic() == before;
         }
         EXPECT_NE(result.status, 124) << words;

@@ -9,12 +9,9 @@ namespace {
 
 using nlohmann::json;
 using test::IsRefused;
-using test::Ran;
-using test::Shell;
 using test::Succeeds;
 using test::Tavoctl;
 using test::Told;
-using test::Words;
 
 class MachineTavoctl : public test::MachineTest {
   protected:
@@ -25,10 +22,10 @@ class MachineTavoctl : public test::MachineTest {
     }
 };
 
-json Facts(Words words)
+json Facts(test::Words words)
 {
     words.insert(words.begin() + 2, "--json");
-    const Ran ran = Tavoctl(words);
+    const test::Ran ran = Tavoctl(words);
     EXPECT_EQ(ran.status, 0) << testing::PrintToString(words) << ran;
     return test::Facts(ran);
 }
@@ -79,14 +76,14 @@ TEST_F(MachineTavoctl, TestsADriveAndReadsItsErrors)
 
     // A drive that works on a test, and then cannot read.
     const std::string failing = "LD_PRELOAD=" TEST_FAILING_DRIVE " tavoctl disk ";
-    const test::CommandResult result = Shell(failing + "test --short --wait sda");
+    const test::CommandResult result = test::Shell(failing + "test --short --wait sda");
     EXPECT_EQ(result.status, 1);
     EXPECT_THAT(result.output, testing::HasSubstr("the test failed: it cannot read"));
     EXPECT_EQ(Told("cat /tmp/asked"), "test 1\nrunning\nrunning\nfailed\n");
-    const json health = json::parse(Shell(failing + "health --json sda").output).at("items").at(0);
+    const json health = json::parse(test::Shell(failing + "health --json sda").output).at("items").at(0);
     EXPECT_EQ(health.at("verdict"), "failing");
     EXPECT_EQ(health.at("errors"), 1);
-    const json error = json::parse(Shell(failing + "errors --json sda").output).at("items").at(0);
+    const json error = json::parse(test::Shell(failing + "errors --json sda").output).at("items").at(0);
     EXPECT_EQ(error.at("error"), "the sector cannot be read");
     EXPECT_EQ(error.at("sector"), 4711);
     Told("rm -f /tmp/asked");
@@ -166,7 +163,7 @@ TEST_F(MachineTavoctl, ShowsHowFarARebuildIs)
     EXPECT_EQ(array.at("action"), "recover");
     EXPECT_LT(array.at("percent"), 100);
     EXPECT_EQ(array.at("spare"), json({"/dev/sdb"}));
-    const Ran seen = test::TavoctlAtTerminal({"raid", "wait", "--timeout", "3", "md4"});
+    const test::Ran seen = test::TavoctlAtTerminal({"raid", "wait", "--timeout", "3", "md4"});
     EXPECT_THAT(seen.out, testing::ContainsRegex("md4: recover [0-9]+ %, [0-9.]+ MiB/s, .* left"));
     Told("echo 200000 >/sys/block/md4/md/sync_speed_max");
     Succeeds({"raid", "wait", "--timeout", "120", "md4"});

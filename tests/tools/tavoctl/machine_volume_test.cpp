@@ -10,13 +10,8 @@ namespace {
 
 using nlohmann::json;
 using test::IsRefused;
-using test::Ran;
-using test::Shell;
 using test::Succeeds;
-using test::Tavoctl;
 using test::Told;
-using test::Words;
-using testing::HasSubstr;
 
 class MachineVolumes : public test::MachineTest {
   protected:
@@ -27,9 +22,9 @@ class MachineVolumes : public test::MachineTest {
     }
 };
 
-json Facts(const Words &words)
+json Facts(const test::Words &words)
 {
-    const Ran ran = Tavoctl(words);
+    const test::Ran ran = test::Tavoctl(words);
     EXPECT_EQ(ran.status, 0) << testing::PrintToString(words) << ran;
     return test::Facts(ran);
 }
@@ -166,11 +161,11 @@ TEST_F(MachineVolumes, StartsUnsafeArraysOnlyOnRequest)
               "/dev/md2 is not started: only 1 of 3 members are there and up to date, and it takes 2", 1);
     EXPECT_EQ(Facts({"raid", "list", "--json"}), json::array());
     IsRefused({"raid", "assemble", "md2"}, "--force says what may be lost", 1);
-    const Ran asked = Tavoctl({"raid", "assemble", "--force", "md2"});
+    const test::Ran asked = test::Tavoctl({"raid", "assemble", "--force", "md2"});
     EXPECT_EQ(asked.status, 2) << asked;
     EXPECT_THAT(asked.err, testing::ContainsRegex("/dev/sda: slot 0, [0-9]+ events"));
-    EXPECT_THAT(asked.err, HasSubstr("may be lost or damaged"));
-    EXPECT_EQ(Tavoctl({"raid", "assemble", "--yes", "--force", "md2"}).status, 0);
+    EXPECT_THAT(asked.err, testing::HasSubstr("may be lost or damaged"));
+    EXPECT_EQ(test::Tavoctl({"raid", "assemble", "--yes", "--force", "md2"}).status, 0);
     EXPECT_EQ(Facts({"raid", "list", "--json"}).at(0).at("status"), "degraded");
     EXPECT_EQ(Told("head -c 1M /dev/md2 | wc -c"), "1048576\n");
 }

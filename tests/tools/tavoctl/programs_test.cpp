@@ -11,12 +11,9 @@
 namespace {
 
 using nlohmann::json;
-using test::ReadFile;
 using test::ScratchDir;
 using test::Tavoctl;
-using test::Words;
 using test::WriteFile;
-using testing::HasSubstr;
 
 constexpr unsigned at_once = TAVO_LOCK_EXCLUSIVE | TAVO_LOCK_NONBLOCKING;
 
@@ -39,7 +36,7 @@ TEST(TavoctlPrograms, LockRunGivesTheStatusOfItsProgram)
     const ScratchDir dir;
     WriteFile(dir / "text", "no program");
     const struct {
-        Words words;
+        test::Words words;
         int status;
         const char *out;
     } cases[] = {
@@ -91,7 +88,7 @@ TEST(TavoctlPrograms, WhoWatchesSeesWhatIsWaitedFor)
     ASSERT_EQ(ErrTLIBFileLock(TAVO_LOCK_USER | at_once, 0), 0);
     const test::Ran ran = test::TavoctlAtTerminal({"lock", "run", "--timeout", "1", "pw", "--", "true"});
     EXPECT_EQ(ran.status, 4);
-    EXPECT_THAT(ran.out, HasSubstr("waiting for the lock pw: 1 s left"));
+    EXPECT_THAT(ran.out, testing::HasSubstr("waiting for the lock pw: 1 s left"));
     EXPECT_EQ(ErrTLIBFileUnlock(TAVO_LOCK_USER), 0);
 }
 
@@ -149,20 +146,16 @@ TEST(TavoctlPrograms, ProcRunIsAClean30ArgumentChildWithALimit)
     EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(5));
 
     ::setenv("SECRET", "1", 1);
-    const test::Ran silent =
-        Tavoctl({"proc", "run", "sh", "-c", "echo $# \"$PWD\" \"$SECRET\" >" + dir / "out" + "; echo loud",
-                 "x",    "1",   "2",  "3",  "4",
-                 "5",    "6",   "7",  "8",  "9",
-                 "10",   "11",  "12", "13", "14",
-                 "15",   "16",  "17", "18", "19",
-                 "20",   "21",  "22", "23", "24",
-                 "25",   "26",  "27"});
+    test::Words words = {"proc", "run", "sh", "-c", "echo $# \"$PWD\" \"$SECRET\" >" + dir / "out" + "; echo loud",
+                         "x"};
+    for (int i = 1; i <= 27; ++i)
+        words.push_back(std::to_string(i));
+    const test::Ran silent = Tavoctl(words);
     ::unsetenv("SECRET");
     EXPECT_EQ(silent.status, 0);
     EXPECT_EQ(silent.out, "");
-    EXPECT_EQ(ReadFile(dir / "out"), "27 / \n");
-    Words words = {"proc", "run", "true"};
-    words.resize(3 + 31, "x");
+    EXPECT_EQ(test::ReadFile(dir / "out"), "27 / \n");
+    words.push_back("28");
     EXPECT_EQ(Tavoctl(words).status, 2);
 }
 

@@ -12,8 +12,6 @@ namespace {
 
 using nlohmann::json;
 using test::Tavoctl;
-using test::Words;
-using testing::HasSubstr;
 using testing::MatchesRegex;
 
 constexpr const char *kVolumes[] = {"/volume1", "/volume2"};
@@ -31,9 +29,9 @@ std::string ScriptLog()
 }
 
 // The row of one service in the JSON table.
-json Row(const std::string &service, const Words &options = {})
+json Row(const std::string &service, const test::Words &options = {})
 {
-    Words words = {"service", "list", "--json"};
+    test::Words words = {"service", "list", "--json"};
     words.insert(words.end(), options.begin(), options.end());
     for (const json &row : test::Facts(words)) {
         if (row.at("name") == service)
@@ -112,7 +110,7 @@ TEST_F(TavoctlService, StatusGivesThreeWhenItIsNotRunning)
 {
     const test::Ran off = Tavoctl({"service", "status", "web"});
     EXPECT_EQ(off.status, 3);
-    EXPECT_THAT(off.out, HasSubstr("running:  no\n"));
+    EXPECT_THAT(off.out, testing::HasSubstr("running:  no\n"));
     EXPECT_EQ(off.err, "");
     ASSERT_EQ(Tavoctl({"service", "enable", "--wait", "30", "web"}).status, 0);
     EXPECT_EQ(Tavoctl({"service", "status", "web"}).status, 0);
@@ -203,7 +201,7 @@ TEST_F(TavoctlService, VolumeBindsTheFoldersAndRestoreFindsThemAgain)
     EXPECT_EQ(LinkTarget("/var/services/web"), "/volume2/web");
     EXPECT_EQ(Tavoctl({"service", "volume", "web", "1"}).status, 0);
     EXPECT_EQ(LinkTarget("/var/services/web"), "/volume1/web");
-    EXPECT_THAT(ScriptLog(), HasSubstr("S97apache-user.sh restart"));
+    EXPECT_THAT(ScriptLog(), testing::HasSubstr("S97apache-user.sh restart"));
 
     EXPECT_EQ(Tavoctl({"service", "volume", "web", "/volume7"}).status, 3) << "not mounted";
     EXPECT_EQ(Tavoctl({"service", "volume", "ftp", "/volume1"}).status, 2) << "it keeps no data";
@@ -256,7 +254,7 @@ TEST_F(TavoctlService, WatchPrintsWhenSomethingHasChanged)
         return;
     const test::Ran seen = test::TavoctlAtTerminal(
         {"lock", "run", "apple", "--", "timeout", "-s", "TERM", "2", "tavoctl", "service", "list", "--watch"});
-    EXPECT_THAT(seen.out, HasSubstr("\x1b[H\x1b[JNAME"));
+    EXPECT_THAT(seen.out, testing::HasSubstr("\x1b[H\x1b[JNAME"));
 }
 
 }  // namespace

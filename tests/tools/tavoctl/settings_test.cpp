@@ -14,9 +14,6 @@ using test::ScratchDir;
 using test::Tavoctl;
 using test::Words;
 using test::WriteFile;
-using testing::HasSubstr;
-using testing::IsEmpty;
-using testing::StartsWith;
 
 constexpr char settings[] = "# ours\nname=\"a nas\"\nmode=one\nmode=two\nempty=\n";
 constexpr char sections[] = "; head\n[a]\nk=1\n# note\nl=2\n[b]\nk=3\n";
@@ -129,7 +126,7 @@ TEST(TavoctlSettings, ChangesAreShownFirstAndThenMadeOrRefused)
         EXPECT_EQ(state.st_mode & 07777u, 0640u);
     }
     for (const auto &entry : std::filesystem::directory_iterator("/tmp"))
-        EXPECT_THAT(entry.path().filename().string(), testing::Not(StartsWith("tavoctl.")));
+        EXPECT_THAT(entry.path().filename().string(), testing::Not(testing::StartsWith("tavoctl.")));
 }
 
 TEST(TavoctlSettings, DryRunPrintsAUnifiedDiff)
@@ -183,7 +180,7 @@ TEST(TavoctlSettings, ReportsMissingPermission)
     for (const Words &words : std::vector<Words>{{"conf", "set", "mode", "x"}, {"conf", "remove", "mode"}}) {
         const test::Ran ran = test::AsNobody([&] { return Tavoctl(In(path, words)); });
         EXPECT_EQ(ran.status, 5) << ran;
-        EXPECT_THAT(ran.err, HasSubstr("run it as root"));
+        EXPECT_THAT(ran.err, testing::HasSubstr("run it as root"));
     }
     EXPECT_EQ(ReadFile(path), settings);
     // His own file is his own business.
@@ -193,7 +190,7 @@ TEST(TavoctlSettings, ReportsMissingPermission)
                   return Tavoctl(In(path, {"conf", "set", "--json", "empty", "no more"}));
               }).status,
               0);
-    EXPECT_THAT(ReadFile(path), HasSubstr("empty=no more\n"));
+    EXPECT_THAT(ReadFile(path), testing::HasSubstr("empty=no more\n"));
 }
 
 TEST(TavoctlSettings, ReadingShowsTheFactsAsTextAndAsJson)
@@ -239,7 +236,7 @@ TEST(TavoctlSettings, MissingFileIsNotFoundUnlessItIsToBeMade)
                                                  {"section", "set", "a", "k=1"},
                                                  {"section", "remove", "--yes", "a"}})
         EXPECT_EQ(Tavoctl(In(dir / "none", words)).status, 3) << testing::PrintToString(words);
-    EXPECT_THAT(dir.Names(), IsEmpty());
+    EXPECT_THAT(dir.Names(), testing::IsEmpty());
     EXPECT_EQ(Tavoctl(In(dir.Path(), {"conf", "get", "k"})).status, 1);
     EXPECT_EQ(Tavoctl(In("/no/such/folder/f", {"conf", "set", "k", "v"})).status, 1);
 

@@ -10,12 +10,8 @@
 namespace {
 
 using nlohmann::json;
-using test::Ran;
 using test::Tavoctl;
 using test::Words;
-using test::WriteFile;
-using testing::AnyOf;
-using testing::HasSubstr;
 
 constexpr char uuid[] = "495e879a:4e806313:a484c744:9c844bd2";
 
@@ -70,7 +66,7 @@ TEST(TavoctlStorage, NoNameBecomesACommand)
             {"lvm", "remove", "--yes", "--", names[i]},
         };
         const Words &words = lines[i / 9 % std::size(lines)];
-        EXPECT_THAT(Tavoctl(words).status, AnyOf(2, 3)) << testing::PrintToString(words);
+        EXPECT_THAT(Tavoctl(words).status, testing::AnyOf(2, 3)) << testing::PrintToString(words);
     }
     EXPECT_FALSE(std::filesystem::exists(test::kCanary));
     // Whether there is such a group is asked before its devices are looked at.
@@ -181,7 +177,7 @@ TEST(TavoctlStorage, SuperblocksAreATable)
     test::Scenario scenario;
     scenario.Expect({"/sbin/mdadm", "-E", "/dev/sda3"}).Prints(test::Capture("mdadm_E_1.2_raid5-mdadm-4.2"));
     scenario.Expect({"/sbin/mdadm", "-E", "/dev/sdb3"});
-    const Ran ran = Tavoctl({"raid", "superblock", "--json", "sda3", "/dev/sdb3"});
+    const test::Ran ran = Tavoctl({"raid", "superblock", "--json", "sda3", "/dev/sdb3"});
     ASSERT_EQ(ran.status, 0) << ran;
     const json rows = test::Facts(ran);
     ASSERT_EQ(rows.size(), 1u);
@@ -199,13 +195,13 @@ TEST(TavoctlStorage, SuperblocksAreATable)
 TEST(TavoctlStorage, WipingTellsHowFarItIs)
 {
     const std::string file = "/tmp/tavodd.sdz";
-    WriteFile(file, "1610612736/4294967296\n");
+    test::WriteFile(file, "1610612736/4294967296\n");
     const json facts = test::Facts({"disk", "wipe-status", "--json", "sdz"});
     EXPECT_EQ(facts.at("done"), 1610612736);
     EXPECT_EQ(facts.at("percent"), 37);
     EXPECT_THAT(Tavoctl({"disk", "wipe-status", "sdz"}).out,
-                AllOf(HasSubstr("done:     1.5 GiB\n"), HasSubstr("total:    4.0 GiB\n")));
-    WriteFile(file, "much\n");
+                AllOf(testing::HasSubstr("done:     1.5 GiB\n"), testing::HasSubstr("total:    4.0 GiB\n")));
+    test::WriteFile(file, "much\n");
     EXPECT_EQ(Tavoctl({"disk", "wipe-status", "sdz"}).status, 1);
     std::filesystem::remove(file);
 }
@@ -213,7 +209,7 @@ TEST(TavoctlStorage, WipingTellsHowFarItIs)
 TEST(TavoctlStorage, LayoutsAreAllThereHaveBeen)
 {
     test::Scenario scenario;  // no disk is asked: there is none
-    const Ran ran = Tavoctl({"partition", "layout", "--wake", "--json"});
+    const test::Ran ran = Tavoctl({"partition", "layout", "--wake", "--json"});
     ASSERT_EQ(ran.status, 0) << ran;
     const json rows = test::Facts(ran);
     ASSERT_EQ(rows.size(), 10u);

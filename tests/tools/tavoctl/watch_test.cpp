@@ -8,7 +8,6 @@
 namespace {
 
 using nlohmann::json;
-using test::Shell;
 
 // Runs the watch with its output in a file until it is stopped.
 class Watching {
@@ -19,7 +18,7 @@ class Watching {
         pid_ = std::stoi(test::Told("tavoctl watch --json " + options + " >>" + place + " 2>&1 & echo $!"));
         ::usleep(500'000);
     }
-    ~Watching() { Shell("kill " + std::to_string(pid_)); }
+    ~Watching() { test::Shell("kill " + std::to_string(pid_)); }
 
     bool Tells(const char *event, const std::string &object, const std::string &detail = "") const
     {
@@ -48,7 +47,7 @@ class Watching {
 
     bool EndsWhenAsked() const
     {
-        Shell("kill " + std::to_string(pid_));
+        test::Shell("kill " + std::to_string(pid_));
         return test::Eventually([&] { return !std::filesystem::exists("/proc/" + std::to_string(pid_)); });
     }
 

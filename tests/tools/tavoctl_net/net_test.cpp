@@ -11,17 +11,11 @@
 #include <sys/socket.h>
 
 using test::Eventually;
-using test::kIfcfg;
-using test::kNetwork;
-using test::kOldFile;
-using test::kOldNetwork;
 using test::Node;
 using test::Ran;
 using test::ReadFile;
 using test::RunningTavoctl;
 using test::Tavoctl;
-using test::VirtualCable;
-using test::WriteFile;
 using testing::AllOf;
 using testing::HasSubstr;
 
@@ -59,10 +53,7 @@ class Net : public test::NetScene {
     {
         auto node = std::make_unique<Node>(name);
         cable_->Plug(*node, "eth0");
-        EXPECT_TRUE(node->Run([] {
-            test::WriteOldFiles();
-            return true;
-        }));
+        node->Do([] { test::WriteOldFiles(); });
         Start(*node);
         return node;
     }
@@ -72,7 +63,7 @@ class Net : public test::NetScene {
 
 TEST_F(Net, ShowsWhatWasSet)
 {
-    EXPECT_TRUE(here_->Run([] {
+    here_->Do([] {
         EXPECT_EQ(Tavoctl({"net", "set", "192.0.2.20/25", "--gateway", "192.0.2.99"}).status, 0);
         EXPECT_EQ(Tavoctl({"net", "dns", "192.0.2.53", "2001:db8::53"}).status, 0);
         EXPECT_EQ(Tavoctl({"net", "hostname", "attic"}).status, 0);
@@ -93,11 +84,10 @@ TEST_F(Net, ShowsWhatWasSet)
         EXPECT_THAT(Tavoctl({"net", "show", "--json"}).out,
                     AllOf(HasSubstr(R"("ipv6": false)"), HasSubstr(R"("ipv6_addresses": [])")));
         EXPECT_THAT(Tavoctl({"net", "show"}).out, HasSubstr("192.0.2.20"));
-        return true;
-    }));
-    VirtualCable second("second");
+    });
+    test::VirtualCable second("second");
     second.Plug(*here_, "eth1");
-    EXPECT_TRUE(here_->Run([] {
+    here_->Do([] {
         const nlohmann::json cards = test::Facts({"net", "show", "--json"});
         EXPECT_EQ(cards.size(), 2u) << cards;
         EXPECT_EQ(cards.at(1).at("interface"), "eth1");
@@ -105,13 +95,12 @@ TEST_F(Net, ShowsWhatWasSet)
         EXPECT_EQ(test::Facts({"net", "show", "--json", "eth1"}), cards.at(1));
         EXPECT_THAT(Tavoctl({"net", "show"}).out, AllOf(HasSubstr("eth0"), HasSubstr("eth1"), HasSubstr("attic")));
         EXPECT_EQ(Tavoctl({"net", "show", "eth7"}).status, 3);
-        return true;
-    }));
+    });
 }
 
 TEST_F(Net, RefusesWhatCannotBe)
 {
-    EXPECT_TRUE(here_->Run([] {
+    here_->Do([] {
         const std::string live = Live();
         const struct {
             test::Words words;
@@ -143,17 +132,16 @@ TEST_F(Net, RefusesWhatCannotBe)
         for (const auto &row : rows)
             test::IsRefused(row.words, row.says, row.status);
         EXPECT_EQ(Live(), live);
-        EXPECT_EQ(ReadFile(kIfcfg), kOldFile);
-        EXPECT_EQ(ReadFile(kNetwork), kOldNetwork);
-        return true;
-    }));
+        EXPECT_EQ(ReadFile(test::kIfcfg), test::kOldFile);
+        EXPECT_EQ(ReadFile(test::kNetwork), test::kOldNetwork);
+    });
 }
 
 // A host that answers no ping must answer ARP.
 TEST_F(Net, TakesNoAddressOfAnotherHost)
 {
     ASSERT_EQ(there_->Shell("echo 1 >/proc/sys/net/ipv4/icmp_echo_ignore_all"), 0);
-    EXPECT_TRUE(here_->Run([] {
+    here_->Do([] {
         const std::string live = Live();
         EXPECT_EQ(TAVOIIpConflict("eth0", "192.0.2.99"), 0) << "as it stays";
         EXPECT_EQ(TAVONetAddressProbe("eth0", "192.0.2.99", 20), 1);
@@ -161,12 +149,16 @@ TEST_F(Net, TakesNoAddressOfAnotherHost)
         EXPECT_EQ(TAVONetAddressProbe("eth0", "192.0.2.10", 20), 0) << "our own";
         EXPECT_EQ(TAVONetAddressProbe("eth7", "192.0.2.98", 20), -1);
         EXPECT_EQ(TLIBErrGet(), ERR_FILE_NOT_FOUND);
-        EXPECT_EQ(Tavoctl({"net", "check-address", "192.0.2.99"}).out, "used\n");
+        const Ran used = Tavoctl({"net", "check-address", "192.0.2.99"});
+        EXPECT_EQ(used.status, 4) << used;
+        EXPECT_EQ(used.out, "used\n");
+        const Ran own = Tavoctl({"net", "check-address", "--json", "192.0.2.10"});
+        EXPECT_EQ(own.status, 0) << own;
+        EXPECT_THAT(own.out, HasSubstr(R"("used": false)"));
         test::IsRefused({"net", "set", "192.0.2.99/24"}, "another host uses it");
         EXPECT_EQ(Live(), live);
         EXPECT_EQ(Tavoctl({"net", "set", "--no-probe", "192.0.2.99/24"}).status, 0);
-        return true;
-    }));
+    });
     // Of two that want it at the same time not both get it.
     EXPECT_TRUE(here_->Run([] { return test::ShellStatus("ifconfig eth0 192.0.2.10 netmask 255.255.255.0") == 0; }));
     const auto finds_it_free = [](const Node &node) {
@@ -203,24 +195,11 @@ TEST_F(Net, ShowsWhichPortsAreTaken)
     }));
 }
 
-TEST_F(Net, ChecksWhetherAnAddressIsFree)
-{
-    EXPECT_TRUE(here_->Run([] {
-        const Ran used = Tavoctl({"net", "check-address", "192.0.2.99"});
-        EXPECT_EQ(used.status, 4);
-        EXPECT_EQ(used.out, "used\n");
-        const Ran own = Tavoctl({"net", "check-address", "--json", "192.0.2.10"});
-        EXPECT_EQ(own.status, 0);
-        EXPECT_THAT(own.out, HasSubstr(R"("used": false)"));
-        return true;
-    }));
-}
-
 bool IsAsBefore(const std::string &live)
 {
     EXPECT_EQ(Live(), live);
-    EXPECT_EQ(ReadFile(kIfcfg), kOldFile);
-    EXPECT_EQ(ReadFile(kNetwork), kOldNetwork);
+    EXPECT_EQ(ReadFile(test::kIfcfg), test::kOldFile);
+    EXPECT_EQ(ReadFile(test::kNetwork), test::kOldNetwork);
     return !testing::Test::HasFailure();
 }
 
@@ -247,13 +226,13 @@ TEST_F(Net, ATrialEndsWithoutAnAnswer)
 
 TEST_F(Net, ATrialThatIsConfirmedStays)
 {
-    EXPECT_TRUE(here_->Run([] {
+    here_->Do([] {
         RunningTavoctl trial({"net", "set", "--no-probe", "--try", "60", "192.0.2.20/24"});
         EXPECT_TRUE(Eventually([] { return Live().find("192.0.2.20/24") != std::string::npos; }));
         EXPECT_EQ(Tavoctl({"net", "confirm"}).status, 0);
         EXPECT_EQ(trial.Wait().status, 0);
         EXPECT_TRUE(TrialIsOver());
-        EXPECT_THAT(ReadFile(kIfcfg), HasSubstr("IPADDR=192.0.2.20\n"));
+        EXPECT_THAT(ReadFile(test::kIfcfg), HasSubstr("IPADDR=192.0.2.20\n"));
         EXPECT_EQ(Tavoctl({"net", "confirm"}).status, 3) << "once";
 
         // The old address's connection is cut; the administrator reconnects to the new one and confirms.
@@ -274,17 +253,16 @@ TEST_F(Net, ATrialThatIsConfirmedStays)
             test::TavoctlAtTerminal({"net", "set", "--no-probe", "--try", "60", "192.0.2.50/24"}, "n\n");
         EXPECT_EQ(given_up.status, 1) << given_up;
         EXPECT_THAT(Live(), HasSubstr("192.0.2.40/24"));
-        return true;
-    }));
+    });
 }
 
 // Everything that was changed meanwhile comes back, by whatever it was changed, and cards that were not changed are not
 // touched. When the guardian is killed, the next change or refresh does it.
 TEST_F(Net, ATrialPutsTheWholeNetworkBack)
 {
-    VirtualCable second("second");
+    test::VirtualCable second("second");
     second.Plug(*here_, "eth1");
-    EXPECT_TRUE(here_->Run([] {
+    here_->Do([] {
         EXPECT_EQ(
             test::ShellStatus(
                 "ifconfig eth1 198.51.100.5 netmask 255.255.255.0 up; "
@@ -292,12 +270,12 @@ TEST_F(Net, ATrialPutsTheWholeNetworkBack)
                 "route add -net 233.252.0.0 netmask 255.255.255.0 gw 192.0.2.7; "
                 "ip -6 addr add 2001:db8::5/64 dev eth0; ip -6 route add 2001:db8:9::/48 via 2001:db8::1 dev eth0"),
             0);
-        WriteFile("/etc/tavoinfo.conf", "eth0_mtu=\"1500\"\nother=\"x\"\n");
-        WriteFile("/etc/resolv.conf", "nameserver 192.0.2.53\n");
+        test::WriteFile("/etc/tavoinfo.conf", "eth0_mtu=\"1500\"\nother=\"x\"\n");
+        test::WriteFile("/etc/resolv.conf", "nameserver 192.0.2.53\n");
         EXPECT_EQ(TAVONetHostsRefresh(), 0);
         const auto all = [] {
             const std::string text = Live() + ReadFile("/etc/resolv.conf") + ReadFile("/etc/tavoinfo.conf") +
-                                     ReadFile("/etc/hosts") + ReadFile(kIfcfg) + ReadFile(kNetwork);
+                                     ReadFile("/etc/hosts") + ReadFile(test::kIfcfg) + ReadFile(test::kNetwork);
             return text +
                    test::Output("ip route; ip -4 addr show dev eth1 | grep inet; ip -6 addr show dev eth0 scope "
                                 "global | grep inet6 | sed 's/ tentative//'; ip -6 route show dev eth0 | grep via; "
@@ -310,7 +288,7 @@ TEST_F(Net, ATrialPutsTheWholeNetworkBack)
             EXPECT_EQ(Tavoctl({"net", "dns", "--none"}).status, 0);
             EXPECT_EQ(test::ShellStatus("ip addr add 203.0.113.9/24 dev eth0; ip -6 addr add 2001:db8::6/64 dev eth0"),
                       0);
-            WriteFile("/etc/sysconfig/network-scripts/more-eth0", "address 203.0.113.9/24\n");
+            test::WriteFile("/etc/sysconfig/network-scripts/more-eth0", "address 203.0.113.9/24\n");
         };
         const std::string before = all();
         {
@@ -350,12 +328,11 @@ TEST_F(Net, ATrialPutsTheWholeNetworkBack)
         std::string record = ReadFile("/etc/network.checkpoint");
         record.replace(record.find("boot ") + 5, 4, "past");
         change();
-        WriteFile("/etc/network.checkpoint", record);
+        test::WriteFile("/etc/network.checkpoint", record);
         EXPECT_EQ(TAVONetHostsRefresh(), 0);
         EXPECT_EQ(test::ReadFile("/sys/class/net/eth0/mtu"), "1400\n");
         EXPECT_EQ(ReadFile("/etc/tavoinfo.conf"), "eth0_mtu=\"1500\"\nother=\"x\"\n");
-        return true;
-    }));
+    });
 }
 
 TEST_F(Net, AChangeThatFailsIsNotTried)
@@ -424,12 +401,11 @@ TEST_F(Net, DiscoverListsWhoAnswers)
         GTEST_SKIP() << "the daemon has nobody to become";
     ASSERT_EQ(there_->Shell("/usr/tavo/bin/findhostd"), 0);
     ASSERT_EQ(here_->Shell("/usr/tavo/bin/findhostd"), 0);
-    EXPECT_TRUE(here_->Run([] {
+    here_->Do([] {
         const Ran found = Tavoctl({"discover", "--json"});
         EXPECT_EQ(found.status, 0) << found;
         EXPECT_THAT(found.out, AllOf(HasSubstr(R"("name": "there")"), HasSubstr(R"("address": "192.0.2.99")")));
-        return true;
-    }));
+    });
     // A stream of what happens: a host that is there, has another name, and leaves.
     int renamed[2];
     ASSERT_EQ(::pipe2(renamed, O_CLOEXEC), 0);
@@ -442,7 +418,7 @@ TEST_F(Net, DiscoverListsWhoAnswers)
         there_->Shell("kill $(cat /var/run/findhostd.pid)");
         ::_exit(0);
     }
-    EXPECT_TRUE(here_->Run([&] {
+    here_->Do([&] {
         test::ShellStatus(": >/tmp/stream; tavoctl discover --watch --json >/tmp/stream 2>&1 & echo $! >/tmp/watcher");
         const auto lines = [] {
             std::vector<nlohmann::json> events;
@@ -475,20 +451,18 @@ TEST_F(Net, DiscoverListsWhoAnswers)
         EXPECT_TRUE(comes(3));
         EXPECT_EQ(lines().at(2).at("event"), "departed");
         EXPECT_EQ(test::ShellStatus("kill $(cat /tmp/watcher)"), 0);
-        return !HasFailure();
-    }));
+    });
     ::waitpid(neighbour, nullptr, 0);
     ASSERT_EQ(there_->Shell("/usr/tavo/bin/findhostd"), 0);
-    VirtualCable second("second");
+    test::VirtualCable second("second");
     second.Plug(*here_, "eth1");
-    EXPECT_TRUE(here_->Run([] {
+    here_->Do([] {
         const Ran found = Tavoctl({"discover"});
         EXPECT_EQ(found.status, 0) << found;
         EXPECT_THAT(found.out, HasSubstr("192.0.2.99"));
         EXPECT_EQ(found.err, "") << "a port without a cable is nothing to speak of";
         EXPECT_TRUE(std::filesystem::exists("/tmp/tavods.list")) << "left for other callers";
-        return true;
-    }));
+    });
 }
 
 }  // namespace

@@ -6,16 +6,13 @@
 #include <sys/mount.h>
 
 using nlohmann::json;
-using test::Node;
 using test::Ran;
 using test::ReadFile;
 using test::Tavoctl;
-using test::VirtualCable;
 using test::Words;
 using test::WriteFile;
 using testing::AllOf;
 using testing::HasSubstr;
-using testing::Not;
 
 namespace {
 
@@ -65,7 +62,7 @@ class TavoctlStateOfABox : public testing::Test {
   protected:
     void SetUp() override
     {
-        if (const std::string missing = VirtualCable::Missing(); !missing.empty())
+        if (const std::string missing = test::VirtualCable::Missing(); !missing.empty())
             GTEST_SKIP() << missing;
         if (test::RootLacks("foreign-exec") || test::RootLacks("mount"))
             GTEST_SKIP() << "runs tavoctl on volumes";
@@ -81,9 +78,9 @@ class TavoctlStateOfABox : public testing::Test {
             ::umount2(volume, MNT_DETACH);
     }
 
-    std::unique_ptr<Node> Box(const char *name)
+    std::unique_ptr<test::Node> Box(const char *name)
     {
-        auto box = std::make_unique<Node>(name);
+        auto box = std::make_unique<test::Node>(name);
         cable_->Plug(*box, "eth0");
         EXPECT_EQ(
             box->Shell("rm -rf /usr/tavo/etc/private/smbpasswd /usr/tavo/etc/share.conf /var/services /var/standin/*; "
@@ -92,13 +89,13 @@ class TavoctlStateOfABox : public testing::Test {
         return box;
     }
 
-    std::optional<VirtualCable> cable_;
+    std::optional<test::VirtualCable> cable_;
 };
 
 TEST_F(TavoctlStateOfABox, ComesBackOnAFreshOneAndThenChangesNothing)
 {
     auto old_box = Box("old");
-    EXPECT_TRUE(old_box->Run([] {
+    old_box->Do([] {
         for (const Words &words : std::vector<Words>{
                  {"service", "enable", "userhome"},
                  {"conf", "set", "motto", "a \\ b"},
@@ -123,13 +120,12 @@ TEST_F(TavoctlStateOfABox, ComesBackOnAFreshOneAndThenChangesNothing)
         EXPECT_EQ(::stat(kCarried, &facts), 0);
         EXPECT_EQ(facts.st_mode & 0777, 0600u);
         EXPECT_EQ(Apply(json::parse(ReadFile(kCarried))).out, Apply(json::object()).out) << "nothing differs here";
-        EXPECT_THAT(Tavoctl({"state", "show"}).out, AllOf(HasSubstr("Anna Berg"), Not(HasSubstr("nt_hash"))));
+        EXPECT_THAT(Tavoctl({"state", "show"}).out, AllOf(HasSubstr("Anna Berg"), testing::Not(HasSubstr("nt_hash"))));
         EXPECT_EQ(Tavoctl({"service", "disable", "media", "ftp"}).status, 0);
-        return !HasFailure();
-    }));
+    });
     old_box.reset();
     auto fresh = Box("fresh");
-    EXPECT_TRUE(fresh->Run([] {
+    fresh->Do([] {
         const json wanted = json::parse(ReadFile(kCarried));
         EXPECT_GE(wanted.at("users").size(), 4u) << wanted;
         EXPECT_EQ(wanted.at("settings").at("motto"), "a \\ b");
@@ -143,7 +139,7 @@ TEST_F(TavoctlStateOfABox, ComesBackOnAFreshOneAndThenChangesNothing)
         EXPECT_EQ(ran.status, 0) << ran;
         EXPECT_EQ(json::parse(ran.out).at("changes"), json::parse(planned.out).at("changes"));
         EXPECT_EQ(json::parse(ran.out).at("changes"), test::Facts(differs));
-        EXPECT_THAT(ran.out + differs.out, Not(HasSubstr(wanted.at("users").at(1).at("nt_hash"))));
+        EXPECT_THAT(ran.out + differs.out, testing::Not(HasSubstr(wanted.at("users").at(1).at("nt_hash"))));
         const json again = json::parse(Tavoctl({"state", "show", "--secrets"}).out);
         EXPECT_EQ(json::diff(wanted, again), json::array());
         EXPECT_EQ(test::Facts({"user", "check", "--json"}), json::array());
@@ -156,14 +152,13 @@ TEST_F(TavoctlStateOfABox, ComesBackOnAFreshOneAndThenChangesNothing)
         EXPECT_EQ(Files(), after);
         const Ran same = Tavoctl({"state", "diff", kCarried});
         EXPECT_EQ(same.status, 0) << same;
-        return !HasFailure();
-    }));
+    });
 }
 
 // The address was changed by hand, but not the router.
 TEST_F(TavoctlStateOfABox, AStoredGatewayOutOfReachIsShownAndNotRefused)
 {
-    EXPECT_TRUE(Box("here")->Run([] {
+    Box("here")->Do([] {
         for (const auto &[address, status] : {std::pair("192.0.2.10/24", 0), std::pair("198.51.100.10/24", 2)}) {
             json network = {{"format_version", 1}, {"gateway", "192.0.2.1"}};
             network["cards"] = json::array({{{"name", "eth0"}, {"address", address}}});
@@ -176,13 +171,12 @@ TEST_F(TavoctlStateOfABox, AStoredGatewayOutOfReachIsShownAndNotRefused)
         const Ran differs = Tavoctl({"state", "diff", kFile});
         EXPECT_EQ(differs.status, 1) << differs;
         EXPECT_THAT(differs.out, testing::ContainsRegex("gateway +192.0.2.1 +203.0.113.1")) << "in use, and stored";
-        return !HasFailure();
-    }));
+    });
 }
 
 TEST_F(TavoctlStateOfABox, AServiceWhoseVolumeIsAwayIsTheOnlyOneLeftOut)
 {
-    EXPECT_TRUE(Box("here")->Run([] {
+    Box("here")->Do([] {
         const char *document = R"({"services": [
             {"name": "media", "enabled": true, "folders": ["/volume3/music", "/volume2/video", "/volume1/photo"]},
             {"name": "photo", "enabled": true, "folders": ["/volume3/photo"]},
@@ -197,8 +191,7 @@ TEST_F(TavoctlStateOfABox, AServiceWhoseVolumeIsAwayIsTheOnlyOneLeftOut)
         }
         EXPECT_EQ(test::Facts({"service", "status", "--json", "ftp"}).at("enabled"), true);
         EXPECT_EQ(test::Facts({"service", "status", "--json", "media"}).at("enabled"), false);
-        return !HasFailure();
-    }));
+    });
 }
 
 TEST_F(TavoctlState, ANewUserWithoutAHashIsLocked)
