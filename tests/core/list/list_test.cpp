@@ -289,7 +289,7 @@ TEST(List, WalksEndAtTheLastItemOfAFullList)
     const List all(PslTLIBSzListOr(&addr, addr, TLIB_SZLIST_NEW));
     EXPECT_EQ(Items(all.get()), Items(addr));
     const List none(PslTLIBSzListSub(addr, all.get(), TLIB_SZLIST_NEW));
-    EXPECT_THAT(Items(none.get()), IsEmpty());
+    EXPECT_THAT(Items(none.get()), testing::IsEmpty());
     TLIBISzListClean(addr);
     TLIBSzListSortItems(addr, TLIB_SZLIST_SORTED);
     EXPECT_EQ(addr->nItem, 3);
