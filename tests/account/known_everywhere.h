@@ -3,12 +3,7 @@
 #define TESTS_ACCOUNT_KNOWN_EVERYWHERE_H
 
 #include "account/group/group_fixture.h"
-#include "support/scratch_dir.h"
-
-#include <gtest/gtest.h>
-
-#include <filesystem>
-#include <map>
+#include "support/test.h"
 
 namespace test {
 

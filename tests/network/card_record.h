@@ -4,8 +4,7 @@
 
 #include "tavo_net.h"
 
-#include <cstring>
-#include <vector>
+#include "support/test.h"
 
 namespace test {
 

@@ -5,13 +5,7 @@
 #include "tavo_lock.h"
 
 #include "support/own_child.h"
-
-#include <gtest/gtest.h>
-
-#include <optional>
-
-#include <fcntl.h>
-#include <unistd.h>
+#include "support/test.h"
 
 namespace test {
 

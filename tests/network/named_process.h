@@ -2,19 +2,8 @@
 #ifndef TESTS_NETWORK_NAMED_PROCESS_H
 #define TESTS_NETWORK_NAMED_PROCESS_H
 
-#include "support/eventually.h"
 #include "support/own_child.h"
-#include "support/scratch_dir.h"
-
-#include <gtest/gtest.h>
-
-#include <optional>
-#include <string>
-#include <utility>
-
-#include <fcntl.h>
-#include <sys/wait.h>
-#include <unistd.h>
+#include "support/test.h"
 
 namespace test {
 

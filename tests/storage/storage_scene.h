@@ -2,19 +2,15 @@
 #ifndef TESTS_STORAGE_STORAGE_SCENE_H
 #define TESTS_STORAGE_STORAGE_SCENE_H
 
-#include "support/captured_log.h"
 #include "support/captures.h"
 #include "support/container_text.h"
 #include "support/device_tree.h"
-#include "support/fault_state.h"
 #include "support/recorded_calls.h"
 #include "support/recorded_commands.h"
 #include "support/story.h"
-
-#include <gmock/gmock.h>
+#include "support/test.h"
 
 #include <initializer_list>
-#include <string>
 
 namespace test {
 

@@ -1,25 +1,12 @@
 // The stores of the account families: values, reserved keys, walks, and files that are none.
 #include "tavo_bdb.h"
 
-#include "support/captured_log.h"
-#include "support/fault_state.h"
-#include "support/scratch_dir.h"
-
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 #include <chrono>
-#include <csignal>
-#include <cstring>
 #include <ctime>
-#include <functional>
-#include <memory>
-#include <string>
-#include <vector>
 
-#include <fcntl.h>
 #include <sys/resource.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 using namespace std::string_literals;
 using test::Fault;

@@ -6,15 +6,8 @@
 #include "account/group/group_fixture.h"
 #include "account/known_everywhere.h"
 #include "support/rounds.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 #include "support/traced_call.h"
-
-#include <gtest/gtest.h>
-
-#include <functional>
-
-#include <sys/stat.h>
-#include <unistd.h>
 
 // Hashes take their salt from the clock.
 extern "C" time_t time(time_t *out) noexcept

@@ -11,11 +11,7 @@
 #include "account/detail/shadow_line.h"
 #include "account/detail/smbpasswd_line.h"
 #include "account/detail/user_texts.h"
-#include "support/scratch_dir.h"
-
-#include <gtest/gtest.h>
-
-#include <fcntl.h>
+#include "support/test.h"
 
 using namespace std::string_literals;
 

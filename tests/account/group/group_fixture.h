@@ -5,11 +5,7 @@
 #include "tavo_group.h"
 
 #include "account/user/user_fixture.h"
-
-#include <memory>
-#include <string>
-#include <utility>
-#include <vector>
+#include "support/test.h"
 
 namespace test {
 

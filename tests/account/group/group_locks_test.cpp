@@ -2,12 +2,7 @@
 #include "tavo_lock.h"
 
 #include "account/group/group_fixture.h"
-
-#include <gtest/gtest.h>
-
-#include <set>
-#include <string>
-#include <vector>
+#include "support/test.h"
 
 #include <dlfcn.h>
 #include <sys/file.h>

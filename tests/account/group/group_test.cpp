@@ -1,17 +1,8 @@
 // Groups: names, records, what is refused, what the files say, and who else hears of it.
 #include "account/group/group_fixture.h"
-#include "support/captured_log.h"
 #include "support/container_text.h"
-#include "support/fault_state.h"
 #include "support/story.h"
-
-#include <gmock/gmock.h>
-
-#include <functional>
-
-#include <fcntl.h>
-#include <sys/stat.h>
-#include <unistd.h>
+#include "support/test.h"
 
 using namespace std::string_literals;
 using test::AddGroup;

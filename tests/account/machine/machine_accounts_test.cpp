@@ -5,12 +5,7 @@
 #include "account/group/group_fixture.h"
 #include "account/user/user_fixture.h"
 #include "support/machine.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
-
-#include <filesystem>
-#include <sstream>
+#include "support/test.h"
 
 namespace {
 

@@ -9,26 +9,14 @@
 #include "account/user/user_fixture.h"
 #include "support/machine.h"
 #include "support/rounds.h"
+#include "support/test.h"
 
-#include <gtest/gtest.h>
-
-#include <algorithm>
 #include <atomic>
-#include <cstdio>
-#include <filesystem>
-#include <functional>
-#include <map>
 #include <random>
-#include <set>
-#include <string>
-#include <utility>
-#include <vector>
 
 #include <sched.h>
 #include <sys/mman.h>
 #include <sys/mount.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 namespace {
 

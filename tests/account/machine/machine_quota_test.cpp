@@ -4,18 +4,12 @@
 #include "tavo_user.h"
 
 #include "account/user/user_fixture.h"
-#include "support/fault_state.h"
 #include "support/machine.h"
-
-#include <gmock/gmock.h>
+#include "support/test.h"
 
 #include <array>
 
-#include <errno.h>
-#include <fcntl.h>
-#include <string.h>
 #include <sys/quota.h>
-#include <sys/stat.h>
 
 namespace {
 

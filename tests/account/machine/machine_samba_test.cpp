@@ -5,19 +5,11 @@
 #include "account/user/user_fixture.h"
 #include "support/machine.h"
 #include "support/rounds.h"
-#include "support/scratch_dir.h"
+#include "support/test.h"
 
-#include <algorithm>
 #include <atomic>
-#include <map>
-#include <sstream>
-#include <string>
-#include <vector>
 
-#include <signal.h>
 #include <sys/mman.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 namespace {
 

@@ -3,20 +3,15 @@
 #include "tavo_user.h"
 
 #include "account/user/user_fixture.h"
-#include "support/captured_log.h"
 #include "support/container_text.h"
 #include "support/device_tree.h"
 #include "support/scenario.h"
 #include "support/story.h"
-
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 #include <cmath>
-#include <cstring>
 #include <limits>
-#include <utility>
 
-#include <errno.h>
 #include <sys/quota.h>
 
 namespace {

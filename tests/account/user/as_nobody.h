@@ -2,11 +2,9 @@
 #ifndef TESTS_ACCOUNT_USER_AS_NOBODY_H
 #define TESTS_ACCOUNT_USER_AS_NOBODY_H
 
-#include <string>
+#include "support/test.h"
 
 #include <grp.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 namespace test {
 

@@ -5,16 +5,10 @@
 #include "tavo_user.h"
 
 #include "account/user/user_fixture.h"
-#include "support/captured_log.h"
 #include "support/domain_entries.h"
+#include "support/test.h"
 
-#include <gtest/gtest.h>
-
-#include <cstring>
 #include <ctime>
-
-#include <fcntl.h>
-#include <unistd.h>
 
 namespace {
 

@@ -11,21 +11,13 @@
 #include "support/container_text.h"
 #include "support/planted_name.h"
 #include "support/rounds.h"
-
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 #include <atomic>
 #include <chrono>
-#include <cstring>
-#include <functional>
-#include <set>
-#include <utility>
 
 #include <dirent.h>
-#include <fcntl.h>
-#include <signal.h>
 #include <sys/mman.h>
-#include <sys/stat.h>
 
 namespace {
 

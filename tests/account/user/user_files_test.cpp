@@ -2,12 +2,7 @@
 #include "tavo_user.h"
 
 #include "account/user/user_fixture.h"
-#include "support/captured_log.h"
-#include "support/fault_state.h"
-
-#include <gtest/gtest.h>
-
-#include <functional>
+#include "support/test.h"
 
 #include <dlfcn.h>
 #include <pwd.h>

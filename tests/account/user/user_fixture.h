@@ -4,17 +4,10 @@
 
 #include "tavo_user.h"
 
-#include "support/scratch_dir.h"
+#include "support/test.h"
 #include "support/text_lines.h"
 
 #include <array>
-#include <cstdio>
-#include <filesystem>
-#include <memory>
-#include <optional>
-#include <string>
-#include <utility>
-#include <vector>
 
 namespace test {
 

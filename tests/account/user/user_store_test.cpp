@@ -5,22 +5,12 @@
 
 #include "account/group/group_fixture.h"
 #include "account/user/user_fixture.h"
-#include "support/captured_log.h"
-#include "support/fault_state.h"
 #include "support/rounds.h"
+#include "support/test.h"
 
-#include <gtest/gtest.h>
-
-#include <cerrno>
-#include <cstring>
-#include <functional>
 #include <random>
 
 #include <dlfcn.h>
-#include <fcntl.h>
-#include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 using test::AddUser;
 using test::AllFiles;

@@ -7,18 +7,12 @@
 #include "account/user/user_fixture.h"
 #include "support/machine.h"
 #include "support/rounds.h"
-
-#include <gtest/gtest.h>
+#include "support/test.h"
 
 #include <atomic>
-#include <cstdio>
-#include <functional>
-#include <map>
 
 #include <crypt.h>
 #include <sys/mman.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 using test::GetUser;
 

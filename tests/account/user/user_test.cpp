@@ -4,19 +4,12 @@
 #include "tavo_user.h"
 
 #include "account/user/user_fixture.h"
-#include "support/captured_log.h"
 #include "support/container_text.h"
-#include "support/fault_state.h"
 #include "support/scenario.h"
 #include "support/story.h"
+#include "support/test.h"
 
-#include <gtest/gtest.h>
-
-#include <fcntl.h>
-#include <sys/stat.h>
-#include <sys/wait.h>
 #include <syslog.h>
-#include <unistd.h>
 
 using namespace std::string_literals;
 using test::AddUser;

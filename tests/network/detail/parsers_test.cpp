@@ -6,10 +6,7 @@
 #include "network/detail/route_table.h"
 #include "network/detail/socket_table.h"
 #include "network/detail/undo_step.h"
-
-#include <gtest/gtest.h>
-
-#include <string>
+#include "support/test.h"
 
 namespace {
 

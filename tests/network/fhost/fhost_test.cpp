@@ -3,19 +3,15 @@
 
 #include "network/named_process.h"
 #include "network/net/cards.h"
-#include "support/appliance_root.h"
 #include "support/own_child.h"
 #include "support/owned_container.h"
 #include "support/story.h"
+#include "support/test.h"
 
 #include <chrono>
-#include <functional>
-#include <utility>
 
-#include <fcntl.h>
 #include <sys/file.h>
 #include <sys/socket.h>
-#include <unistd.h>
 
 using test::Cards;
 using test::ReadFile;

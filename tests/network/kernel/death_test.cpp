@@ -6,20 +6,8 @@
 #include "support/container_text.h"
 #include "support/network_scene.h"
 #include "support/rounds.h"
+#include "support/test.h"
 #include "support/traced_call.h"
-
-#include <gmock/gmock.h>
-
-#include <algorithm>
-#include <cstdlib>
-#include <cstring>
-#include <filesystem>
-#include <functional>
-#include <iterator>
-#include <optional>
-#include <sstream>
-#include <string>
-#include <vector>
 
 #include <arpa/inet.h>
 #include <netdb.h>
@@ -27,8 +15,6 @@
 #include <sys/mount.h>
 #include <sys/socket.h>
 #include <sys/utsname.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 using test::Bond;
 using test::Card;

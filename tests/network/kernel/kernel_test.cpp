@@ -3,13 +3,8 @@
 
 #include "network/card_record.h"
 #include "support/container_text.h"
-#include "support/fault_state.h"
 #include "support/network_scene.h"
-
-#include <gmock/gmock.h>
-
-#include <filesystem>
-#include <optional>
+#include "support/test.h"
 
 using test::Card;
 using test::Node;

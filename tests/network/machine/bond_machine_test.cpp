@@ -3,12 +3,7 @@
 
 #include "machine_network.h"
 #include "network/card_record.h"
-#include "support/eventually.h"
-
-#include <gtest/gtest.h>
-
-#include <filesystem>
-#include <map>
+#include "support/test.h"
 
 using test::Eventually;
 using test::Happen;

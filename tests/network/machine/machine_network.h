@@ -3,10 +3,7 @@
 #define TESTS_NETWORK_MACHINE_MACHINE_NETWORK_H
 
 #include "support/machine.h"
-#include "support/scratch_dir.h"
-
-#include <filesystem>
-#include <string>
+#include "support/test.h"
 
 namespace test {
 

@@ -6,14 +6,10 @@
 #include "support/container_text.h"
 #include "support/own_child.h"
 #include "support/story.h"
+#include "support/test.h"
 #include "support/text_lines.h"
 
-#include <csignal>
-#include <iterator>
-
 #include <dlfcn.h>
-#include <fcntl.h>
-#include <unistd.h>
 
 using test::Cards;
 using test::kScripts;

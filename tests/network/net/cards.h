@@ -2,20 +2,9 @@
 #ifndef TESTS_NETWORK_NET_CARDS_H
 #define TESTS_NETWORK_NET_CARDS_H
 
-#include "support/captured_log.h"
 #include "support/device_tree.h"
-#include "support/fault_state.h"
 #include "support/recorded_calls.h"
-#include "support/scratch_dir.h"
-
-#include <gmock/gmock.h>
-
-#include <cerrno>
-#include <cstring>
-#include <filesystem>
-#include <map>
-#include <string>
-#include <vector>
+#include "support/test.h"
 
 #include <arpa/inet.h>
 #include <net/if.h>

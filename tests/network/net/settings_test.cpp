@@ -9,14 +9,12 @@
 #include "support/hostile_names.h"
 #include "support/recorded_commands.h"
 #include "support/story.h"
+#include "support/test.h"
 
-#include <csignal>
 #include <cstdarg>
-#include <sstream>
 
 #include <dlfcn.h>
 #include <sys/syscall.h>
-#include <unistd.h>
 
 using test::Card;
 using test::Cards;

@@ -1,15 +1,9 @@
 // Validators and conversions: tables of what is accepted and refused, and a comparison with the C library's own view.
 #include "tavo_net.h"
 
-#include "support/fault_state.h"
+#include "support/test.h"
 
-#include <gtest/gtest.h>
-
-#include <cstring>
 #include <random>
-#include <string>
-#include <utility>
-#include <vector>
 
 #include <arpa/inet.h>
 

@@ -7,13 +7,7 @@
 #include "storage/detail/mdadm_examine.h"
 #include "storage/detail/volume_name.h"
 #include "support/captures.h"
-
-#include <gmock/gmock.h>
-
-#include <optional>
-#include <sstream>
-#include <string>
-#include <utility>
+#include "support/test.h"
 
 namespace {
 

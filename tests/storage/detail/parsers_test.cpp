@@ -13,11 +13,7 @@
 #include "storage/detail/sfdisk_line.h"
 #include "storage/detail/usb_id.h"
 #include "support/captures.h"
-
-#include <gmock/gmock.h>
-
-#include <algorithm>
-#include <cstring>
+#include "support/test.h"
 
 namespace {
 

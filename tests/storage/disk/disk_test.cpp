@@ -3,23 +3,13 @@
 #include "tavo_disk.h"
 
 #include "storage/storage_scene.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
-
-#include <algorithm>
-#include <cerrno>
 #include <climits>
-#include <cstdlib>
-#include <cstring>
-#include <memory>
 #include <random>
-#include <sstream>
-#include <utility>
 
-#include <fcntl.h>
 #include <linux/fs.h>
 #include <linux/hdreg.h>
-#include <unistd.h>
 
 namespace {
 

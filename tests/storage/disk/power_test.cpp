@@ -2,21 +2,11 @@
 #include "tavo_disk.h"
 
 #include "storage/storage_scene.h"
-#include "support/appliance_root.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
-
-#include <algorithm>
-#include <cerrno>
-#include <cstdio>
-#include <cstring>
-#include <set>
-
-#include <fcntl.h>
 #include <linux/fs.h>
 #include <linux/hdreg.h>
 #include <scsi/sg.h>
-#include <unistd.h>
 
 namespace {
 

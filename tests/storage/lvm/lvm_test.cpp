@@ -2,13 +2,9 @@
 #include "tavo_lvm.h"
 
 #include "storage/storage_scene.h"
+#include "support/test.h"
 
-#include <gmock/gmock.h>
-
-#include <cstdio>
 #include <initializer_list>
-
-#include <unistd.h>
 
 using test::CommandReply;
 using test::List;

@@ -7,15 +7,9 @@
 #include "tavo_raid.h"
 
 #include "storage/storage_scene.h"
-
-#include <gmock/gmock.h>
+#include "support/test.h"
 
 #include <cstdint>
-#include <memory>
-#include <string>
-#include <vector>
-
-#include <unistd.h>
 
 using test::MakeList;
 

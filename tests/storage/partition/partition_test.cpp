@@ -2,14 +2,7 @@
 #include "tavo_partition.h"
 
 #include "storage/storage_scene.h"
-#include "support/appliance_root.h"
-
-#include <gmock/gmock.h>
-
-#include <cstdio>
-#include <utility>
-
-#include <unistd.h>
+#include "support/test.h"
 
 namespace {
 

@@ -3,16 +3,7 @@
 #include "tavo_raid.h"
 
 #include "storage/storage_scene.h"
-
-#include <gmock/gmock.h>
-
-#include <cerrno>
-#include <cstdlib>
-#include <cstring>
-#include <filesystem>
-#include <map>
-#include <memory>
-#include <sstream>
+#include "support/test.h"
 
 #include <linux/fs.h>
 #include <linux/major.h>

@@ -4,17 +4,11 @@
 #include "tavo_raid.h"
 
 #include "storage/storage_scene.h"
-
-#include <gmock/gmock.h>
-
-#include <cerrno>
-#include <cstdio>
-#include <functional>
+#include "support/test.h"
 
 #include <linux/fs.h>
 #include <sys/syscall.h>
 #include <sys/utsname.h>
-#include <unistd.h>
 
 namespace {
 
