@@ -8,38 +8,34 @@
 #include "account/detail/domain_part.h"
 #include "account/detail/free_name.h"
 #include "account/detail/store_seal.h"
+#include "core/detail/folder_reader.h"
 #include "core/detail/owner.h"
 
 #include <cstring>
 #include <filesystem>
 
-#include <dirent.h>
 #include <fcntl.h>
 #include <sys/stat.h>
 
 namespace tavo {
 namespace {
 
-struct CloseFolder {
-    void operator()(DIR *folder) const noexcept { ::closedir(folder); }
-};
-
 // Removes build folders (root's, with the mode of mkdtemp) of processes that died. The search is limited, because
 // another user may have filled /tmp.
 void RemoveLeftFolders(const StoreFamily &family)
 {
     constexpr int most = 4096;
-    const std::unique_ptr<DIR, CloseFolder> tmp(::opendir("/tmp"));
+    FolderReader tmp("/tmp");
     const std::string prefix = std::string(family.prefix).substr(sizeof "/tmp") + "tmp.";
-    const dirent *entry = nullptr;
-    for (int i = 0; i < most && tmp && (entry = ::readdir(tmp.get())); ++i) {
+    const char *name = nullptr;
+    for (int i = 0; i < most && (name = tmp.Next()) != nullptr; ++i) {
         struct stat st;
-        if (!std::string_view(entry->d_name).starts_with(prefix) ||
-            ::fstatat(::dirfd(tmp.get()), entry->d_name, &st, AT_SYMLINK_NOFOLLOW) != 0 || st.st_uid != 0 ||
+        if (!std::string_view(name).starts_with(prefix) ||
+            ::fstatat(tmp.Descriptor(), name, &st, AT_SYMLINK_NOFOLLOW) != 0 || st.st_uid != 0 ||
             (st.st_mode & (S_IFMT | 07777)) != (S_IFDIR | 0700))
             continue;
         std::error_code ignored;
-        std::filesystem::remove_all(std::filesystem::path("/tmp") / entry->d_name, ignored);
+        std::filesystem::remove_all(std::filesystem::path("/tmp") / name, ignored);
     }
 }
 
