@@ -517,17 +517,26 @@ class Machine:
             self.monitor('device_del', id='stick')
             self.monitor.wait_for('DEVICE_DELETED', 'stick')
         elif verb in ('pull', 'plug', 'blank') and what.isdigit() and 1 <= int(what) <= self.hardware.disks:
-            bay, hot = int(what), self.hardware.bus == 'scsi'
-            if verb == 'pull' and hot:
-                self.monitor('device_del', id=f'bay{bay}')
-                self.monitor.wait_for('DEVICE_DELETED', f'bay{bay}')
+            bay = int(what)
+            if verb == 'pull':
+                self.plugged(bay, False)
             if verb == 'blank' or how == 'blank':
                 disk = self.disks[bay - 1]
                 disk.truncate(0)
                 size = int(size or self.hardware.size) << 20
                 disk.truncate(size)
                 self.monitor('block_resize', **{'node-name': f'disk{bay}', 'size': size})
-            if verb == 'plug' and hot:
-                self.monitor('device_add', **self._bay(bay))
+            if verb == 'plug':
+                self.plugged(bay)
         else:
             raise ValueError(f'no such event: {verb} {what}')
+
+    def plugged(self, bay, there=True):
+        """A disk comes or goes; on SATA the machine does the work itself."""
+        if self.hardware.bus != 'scsi':
+            return
+        if there:
+            self.monitor('device_add', **self._bay(bay))
+        else:
+            self.monitor('device_del', id=f'bay{bay}')
+            self.monitor.wait_for('DEVICE_DELETED', f'bay{bay}')
