@@ -424,7 +424,8 @@ TEST_F(Refusals, Services)
     Refuses("service_is_on_volume", TAVOServiceIsOnVolume, 1, {"/volume1", "/tmp", "", "/volume", "/volume2/"});
     Refuses("service_link_remove", TAVOServiceLinkRemove, {1, -1, 12});
     Refuses("service_link_set", TAVOServiceLinkSet, 1, {"/volume1/web", ""});
-    Refuses("service_net_service", TAVONetService, {TAVO_DAEMON_CRON, 0}, {TAVO_DAEMON_START, -1, 5});
+    Refuses({"service_net_service", "(#):  bad parameter"}, TAVONetService, {TAVO_DAEMON_CRON, 0},
+            {TAVO_DAEMON_START, -1, 5});
     Refuses("service_new_volume_decide", TAVOServiceNewVolumeDecide, {1, -1, 12}, text, {64, 0});
     Refuses("service_remove", TAVOServiceRemove, {1, -1, 12}, 0);
     Refuses("service_removeby_id", TAVOServiceRemovebyID, {1, -1, 31}, 0);

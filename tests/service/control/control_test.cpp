@@ -190,15 +190,6 @@ TEST(NetService, IgnoresHostilePidFiles)
     }
 }
 
-TEST(NetService, RefusesAndLogs)
-{
-    test::CapturedLog log;
-    EXPECT_EQ(TAVONetService(0, TAVO_DAEMON_START), -1);
-    EXPECT_THAT(log.Texts(),
-                testing::ElementsAre(testing::MatchesRegex("service_net_service\\([0-9]+\\):  bad parameter")));
-    EXPECT_THAT(ScriptCalls(), IsEmpty());
-}
-
 // Start scripts run under the dispatcher's locks: one that takes them waits for its own time-out, and no longer.
 TEST(NetService, ScriptThatLocksFailsInTime)
 {
