@@ -3,6 +3,7 @@
 #include "account/detail/btree.h"
 #include "account/detail/colon_fields.h"
 #include "account/detail/commit_marker.h"
+#include "account/detail/group_texts.h"
 #include "account/detail/id_index.h"
 #include "account/detail/misc_line.h"
 #include "account/detail/passwd_line.h"
@@ -10,8 +11,12 @@
 #include "account/detail/samba_latecomers.h"
 #include "account/detail/shadow_line.h"
 #include "account/detail/smbpasswd_line.h"
+#include "account/detail/user_homes.h"
 #include "account/detail/user_texts.h"
+#include "core/detail/open_file.h"
 #include "support/test.h"
+
+#include <sys/file.h>
 
 using namespace std::string_literals;
 
@@ -251,6 +256,34 @@ TEST(CommitMarker, ReadsWhatItWrites)
     EXPECT_EQ(tavo::FileIdentity("/none"), "-");
     EXPECT_TRUE(tavo::FileIdentity("/etc/passwd").find(":" + std::to_string(test::ReadFile("/etc/passwd").size())) !=
                 std::string::npos);
+}
+
+TEST(GroupTexts, TheGroupOfAllUsersHasNoMembersOfItsOwn)
+{
+    const auto stores = tavo::GroupStoreEntries("users:x:100:ghost,a\nstaff:x:7:a\n", "");
+    EXPECT_EQ(Value(stores[tavo::kGroupNameStore], "USERS"), "users:x:100:\0"s);
+    EXPECT_EQ(Value(stores[tavo::kGroupNameStore], "STAFF"), "staff:x:7:a\0"s);
+}
+
+TEST(UserHomes, AStageThatAnotherProcessRemovesIsLeftAlone)
+{
+    const test::ScratchDir dir;
+    const std::string stage = dir / "stage";
+    test::WriteFile(dir / "file", "");
+    ASSERT_EQ(::mkdir(stage.c_str(), 0700), 0);
+    test::WriteFile(stage + "/letter", "x");
+    bool theirs = false;
+    {
+        const tavo::Fd other = tavo::OpenFd(stage.c_str(), O_RDONLY);
+        ASSERT_EQ(::flock(other.Get(), LOCK_EX), 0);
+        EXPECT_TRUE(tavo::RemoveStage(stage, theirs));
+        EXPECT_TRUE(theirs && std::filesystem::exists(stage));
+    }
+    for (const std::string &path : {stage, stage, dir / "file"}) {
+        EXPECT_EQ(tavo::RemoveStage(path, theirs), path == stage) << path;
+        EXPECT_FALSE(theirs || std::filesystem::exists(stage));
+    }
+    EXPECT_EQ(dir.Names(), (std::vector<std::string>{"file"}));
 }
 
 // What one of Samba's programs wrote into a file that had just been replaced.

@@ -123,7 +123,7 @@ TEST(LockTable, KeepsItsOrder)
         EXPECT_EQ(rgslckList[i].szPath, std::string("/tmp/lock/lock_") + rows[i].name);
         EXPECT_EQ(rgslckList[i].fLockBit, rows[i].bit) << rows[i].name;
         EXPECT_EQ(rgslckList[i].pfLock, nullptr);
-        EXPECT_EQ(rgslckList[i].nRef, 0);
+        EXPECT_EQ(rgslckList[i].nRef + rgslckList[i].nMode, 0);
     }
     EXPECT_STREQ(rgslckList[20].szPath, "");
     EXPECT_EQ(rgslckList[20].fLockBit, 0u);
