@@ -309,7 +309,13 @@ TEST(GroupStores, OpenDatabaseByHand)
     TAVOBDbFree(value);
     for (TAVOBDB *store : {db.pName, db.pGid, db.pDesc})
         EXPECT_EQ(TAVOBDbClose(store), 0);
-    EXPECT_EQ(test::CodeOf(TAVOGroupDBGetFreeGid(nullptr)), ERR_BAD_PARAMETERS);
+    // A group that a program has taken out of the store alone: no file loses its line.
+    ASSERT_TRUE(GetGroup("root"));
+    TAVOBDB *const names = TAVOBDbOpen(TAVO_GROUP_DB_NAME, O_RDWR, 1);
+    EXPECT_EQ(TAVOBDbDelete(names, "LP", 3), 0);
+    EXPECT_EQ(TAVOBDbClose(names), 0);
+    EXPECT_EQ(AddGroup("other"), ERR_WRITE_FAILED);
+    std::filesystem::remove("/tmp/.db.group.seal");
 }
 
 }  // namespace

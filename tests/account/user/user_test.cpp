@@ -9,6 +9,7 @@
 #include "support/story.h"
 #include "support/test.h"
 
+#include <sys/mount.h>
 #include <syslog.h>
 
 using namespace std::string_literals;
@@ -171,6 +172,8 @@ TEST(UserSet, UidsOfTheRange)
     ASSERT_EQ(::unlink("/tmp/.db.user.seal"), 0);
     EXPECT_EQ(AddUser({.name = "full"}), ERR_TOO_MANY_USERS) << "also in stores that were rebuilt";
     EXPECT_EQ(AllFiles(), before);
+    EXPECT_EQ(AddUser({.name = "toor", .uid = 0}), 0);
+    EXPECT_EQ(GetUser("toor")->nUid, 0) << "an id that the caller chose";
 }
 
 TEST_F(Users, ListsByFlagAndText)
@@ -350,7 +353,22 @@ TEST_F(Users, FoldersListsAndServicesFollow)
     EXPECT_TRUE(std::filesystem::is_empty("/volume1/@tmp"));
 }
 
-// A locked account opens with its old password or a new one only; what cannot be done changes nothing.
+// The share is a file system of its own, so a home cannot be renamed into the volume's stage.
+TEST(UserFollowUp, AHomeOnAnotherFileSystemIsMovedByCommand)
+{
+    test::WriteFile("/usr/tavo/etc/share.conf", "[homes]\npath=/volume7/homes\n");
+    std::filesystem::create_directories("/volume7/homes");
+    if (::mount("tmpfs", "/volume7/homes", "tmpfs", 0, nullptr) != 0)
+        GTEST_SKIP() << "cannot mount here";
+    ASSERT_EQ(AddUser({.name = "alice"}), 0);
+    std::filesystem::create_directories("/volume7/homes/alice");
+    test::WriteFile("/volume7/homes/alice/letter", "mine\n");
+    EXPECT_EQ(test::DeleteUser("alice"), 0);
+    EXPECT_FALSE(std::filesystem::exists("/volume7/homes/alice"));
+    EXPECT_TRUE(std::filesystem::is_empty("/volume7/@tmp"));
+    ::umount2("/volume7/homes", MNT_DETACH);
+}
+
 // A folder that is not there is not worth a line; one that cannot be looked for is.
 TEST(UserFollowUp, LogsWhoseHomeCannotBeLookedFor)
 {
@@ -518,6 +536,12 @@ TEST_F(Users, StoreOnlyWhatIsAHash)
     EXPECT_EQ(TAVOBDbClose(names), 0);
     EXPECT_EQ(AddUser({.name = "bob"}), ERR_FORMAT_ERROR);
     std::filesystem::remove("/tmp/.db.user.seal");  // the next call builds them from the files
+    ASSERT_TRUE(GetUser("alice"));
+    TAVOBDB *const rest = TAVOBDbOpen(TAVO_USER_DB_NAME, O_RDWR, 1);
+    EXPECT_EQ(TAVOBDbDelete(rest, "ALICE", 6), 0);
+    EXPECT_EQ(TAVOBDbClose(rest), 0);
+    EXPECT_EQ(AddUser({.name = "bob"}), ERR_WRITE_FAILED) << "no file loses an account's line";
+    std::filesystem::remove("/tmp/.db.user.seal");
 }
 
 }  // namespace

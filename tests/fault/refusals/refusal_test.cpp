@@ -122,6 +122,9 @@ TEST_F(Refusals, Core)
     Refuses("file_set_keys", TLIBFileSetKeys, "/none", hash_, {MayBeNull(), nullptr});
     Refuses("file_set_line", TLIBFileSetLine, "/none", {1, 0, -1}, "x");
     Refuses("file_set_line_by_key", TLIBFileSetLineByKey, "/none", "key", "x");
+    Refuses("file_line_key_match", TLIBILineKeyMatch, "key=x", "key");
+    Refuses("proc_pid_file_create", TAVOProcPidFileCreate, "/none");
+    Refuses("info_set_key_value", TAVOINFOSetKeyValue, "key", "x");
     Refuses("file_is_section", TLIBIFileIsSection, "[part]", 6);
     Refuses("file_touch", TLIBFileTouch, "/none/file");
     Refuses("file_utf8bom_strip", TLIBFileUTF8BomStrip, "/none");
@@ -172,6 +175,7 @@ TEST_F(Refusals, Storage)
     static int32_t *numbers = nullptr;
     static RAIDSBENTRY *entry = nullptr;
     static RAIDSUPERBLOCK superblock;
+    static DISKPATH parsed;
     static RAIDPROGRESS progress;
 
     Refuses("disk_check_power", TAVOIDiskCheckPower, "/dev/none", bytes);
@@ -188,6 +192,7 @@ TEST_F(Refusals, Storage)
     Refuses("disk_is_ssd", TAVODiskIsSSD, "/dev/none");
     Refuses("disk_list_push", DiskListPush, &disks, {MayBeNull(), nullptr, nullptr});
     Refuses("disk_partition_num_get", TAVODiskPartitionNumGet, "/dev/none1", text, {64, 1});
+    Refuses("disk_path_parse", DiskPathParse, "sda", &parsed);
     Refuses("disk_raw_open", TAVOIDiskRawOpen, "/dev/none");
     Refuses("disk_reset", TAVOIDiskReset, "/dev/none");
     Refuses({"disk_set_disk_standby", ":# argument should not be NULL"}, TAVOIDiskSetDiskStandby, "/dev/none");
@@ -303,6 +308,11 @@ TEST_F(Refusals, Accounts)
     static char name[] = "none";
     static TAVOGROUP record = {};
     record.szName = name;
+    static TAVOUSER person = {};
+    person.szName = name;
+    const TAVOUSER *const account = &person;
+    static const TAVOGROUP no_name = {};
+    const Argument<const TAVOGROUP *> nameless(&record, &no_name);
 
     Refuses("bdb_close", TAVOBDbClose, {MayBeNull(), nullptr, nullptr});
     Refuses("bdb_conf_sync_time_get", TAVOBDbConfSyncTimeGet, &store, &number32);
@@ -310,7 +320,15 @@ TEST_F(Refusals, Accounts)
     Refuses("bdb_deprecated_set", TAVOBDbDeprecatedSet, &store, 0);
     Refuses("bdb_domain_expire_time_set", TAVOBDbDomainExpireTimeSet, &store);
     Refuses("bdb_is_need_to_rebuild", TAVOBDbIsNeedToRebuild, &store, 0);
+    Refuses("bdb_domain_expire_time_delete", TAVOBDbDomainExpireTimeDelete, &store);
     Refuses("user_db_get_free_uid", TAVOUserDBGetFreeUid, {&users_open, &users_closed});
+    Refuses("user_db_dump", TAVOUserDBDump, {&users_open, &users_closed});
+    Refuses("user_db_set", TAVOUserDBSet, {&users_open, &users_closed}, {MayBeNull(), nullptr}, account);
+    Refuses("user_set_one", TAVOUserSetOne, {MayBeNull(), nullptr}, account);
+    Refuses("user_expired_date_fill", TAVOUserExpiredDateFill, &person, "2020/01/01");
+    Refuses("user_expired_date_get", TAVOUserExpiredDateGet, account, text, 64);
+    Refuses("group_db_get_free_gid", TAVOGroupDBGetFreeGid, {&groups_open, &groups_closed});
+    Refuses("group_set", TAVOGroupSet, {MayBeNull(), nullptr}, nameless);
     Refuses("group_db_set", TAVOGroupDBSet, {&groups_open, &groups_closed}, {MayBeNull(), nullptr}, &record);
     Refuses("bdb_cursor_get", TAVOBDbCursorGet, &store, 0, &data, &number, &data, &number);
     Refuses("bdb_cursor_set_type", TAVOBDbCursorSetType, &store, {TAVO_BDB_CURSOR_KEY, -1, 100});
@@ -470,6 +488,11 @@ TEST_F(Refusals, NamesBuffersAndFiles)
     char name[] = "DOM\\none";
     TAVOGROUP record = {};
     record.szName = name;
+    char plain_name[] = "none";
+    char *no_member = nullptr;
+    TAVOGROUP plain = {};
+    plain.szName = plain_name;
+    plain.rgszMember = &no_member;
     TAVONETCARD card = {};
     card.nMode = TAVO_NET_STATIC;
     std::strcpy(card.szInterface, "eth0");
@@ -483,6 +506,7 @@ TEST_F(Refusals, NamesBuffersAndFiles)
     fails(ERR_INVALID_GROUPNAME, "group_get", TAVOGroupGet("\xff", &group));
     fails(ERR_INVALID_GROUPNAME, "group_desc_get", TAVOGroupDescGet("\xff", text, sizeof text));
     fails(ERR_INVALID_GROUPNAME, "group_desc_set", TAVOGroupDescSet("\xff", "x"));
+    fails(ERR_NO_SUCH_GROUP, "group_set", TAVOGroupSet("DOM\\none", &plain));
     fails(ERR_INVALID_GROUPNAME, "group_db_set", TAVOGroupDBSet(&groups, nullptr, &record));
     fails(ERR_INVALID_NETNAME, "lnx_set_hostname", TAVOLnxSetHostname("a b"));
     fails(ERR_INVALID_NETNAME, "net_default_gateway_set", TAVONetDefaultGatewaySet("10.0.0"));

@@ -630,6 +630,7 @@ TEST(ServiceVolumeGetbyLink, FollowsAndRefuses)
     ASSERT_EQ(::symlink(("/" + std::string(60, 'x')).c_str(), link.c_str()), 0);
     EXPECT_EQ(FaultOf(follow()), (Fault{ERR_UNKNOWN, "service_volume_getby_link"}))
         << "cut, it would name another folder";
+    EXPECT_STREQ(volume, "");
     ::unlink(link.c_str());
     test::WriteFile(link, "a file");
     EXPECT_EQ(FaultOf(follow()), (Fault{ERR_UNKNOWN, "service_volume_getby_link"}));
