@@ -42,10 +42,14 @@ Story::~Story()
         return;
     const testing::TestInfo &test = *testing::UnitTest::GetInstance()->current_test_info();
     const std::string name = std::string("/") + test.test_suite_name() + "." + test.name() + ".txt";
-    if (const char *kept = std::getenv("TAVO_KEEP_GOLDEN"))
+    if (const char *kept = std::getenv("TAVO_KEEP_GOLDEN")) {
         WriteFile(kept + name, text_);
-    else
-        EXPECT_EQ(text_, ReadFile(golden_ + name)) << "the golden file" << name;
+        return;
+    }
+    const std::string golden = ReadFile(golden_ + name);
+    if (text_ != golden)
+        ADD_FAILURE() << "not as in the golden file " << name.substr(1) << "\n"
+                      << testing::internal::edit_distance::CreateUnifiedDiff(Lines(golden), Lines(text_));
 }
 
 std::string Story::Text(const std::vector<std::string> &texts)

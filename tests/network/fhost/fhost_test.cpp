@@ -5,6 +5,7 @@
 #include "network/net/cards.h"
 #include "support/own_child.h"
 #include "support/owned_container.h"
+#include "support/planted_name.h"
 #include "support/story.h"
 #include "support/test.h"
 
@@ -209,29 +210,31 @@ TEST_F(Discovery, MovesTheListToItsCaller)
     TELL(TAVOFHOSTDumpHost());
 }
 
-TEST_F(Discovery, RemovesForeignFilesAtTheListPath)
+TEST_F(Discovery, PlantedListsAreNotReadAndNotInTheWay)
 {
     const Daemon daemon;
-    test::ScratchDir elsewhere;
-    const std::string victim = elsewhere / "shadow";
-    WriteFile(victim, "root:x\n");
-    const std::vector<std::function<void()>> plants = {
-        [&] { std::filesystem::create_symlink(victim, kList); },
-        [&] { std::filesystem::create_hard_link(victim, kList); },
-        [&] { EXPECT_EQ(::mkfifo(kList, 0666), 0); },
-        [&] {
-            std::filesystem::create_directory(kList);
-            WriteFile(std::string(kList) + "/file", "");
-        },
-    };
-    for (size_t i = 0; i < plants.size(); ++i) {
+    test::Owned<TLIBSZHASH> hosts = test::HashOf({});
+    const auto dump = [](const std::string &what) {
+        EXPECT_EQ(TAVOFHOSTDumpHost(), 0) << what;
+        EXPECT_TRUE(std::filesystem::is_regular_file(std::filesystem::symlink_status(kTaken))) << what;
+        EXPECT_EQ(ReadFile(kTaken), "") << what;
         std::filesystem::remove(kTaken);
-        plants[i]();
-        EXPECT_EQ(TAVOFHOSTDumpHost(), 0) << i;
-        EXPECT_TRUE(std::filesystem::is_regular_file(std::filesystem::symlink_status(kTaken))) << i;
-        EXPECT_EQ(ReadFile(kTaken), "") << i;
-        EXPECT_EQ(ReadFile(victim), "root:x\n") << i;
+    };
+    for (const test::Plant plant : test::kPlants) {
+        test::PlantAt(kTaken, plant);
+        EXPECT_EQ(TAVOFHOSTGet2Hash(hosts), 0) << plant;
+        EXPECT_EQ(test::LastFault(), (test::Fault{ERR_OPEN_FAILED, "fhost_get2_hash"})) << plant;
+        test::RemovePlanted(kTaken);
+        test::PlantAt(kList, plant);
+        dump(testing::PrintToString(plant));
+        if (const std::string aside = test::MovedAside(kList); !aside.empty())
+            test::RemovePlanted(aside);
     }
+    const std::string victim = std::string(kList) + ".target";
+    EXPECT_EQ(ReadFile(victim), "kept");
+    std::filesystem::create_hard_link(victim, kList);
+    dump("a second name of another file");
+    EXPECT_EQ(ReadFile(victim), "kept");
 }
 
 TEST_F(Discovery, TheListIsReadLineByLine)
@@ -264,26 +267,6 @@ TEST_F(Discovery, AHashThatMustGrowStaysTheCallers)
                 std::to_string(i % 200 + 1) + ",x\n";
     WriteFile(kTaken, list);
     EXPECT_EQ(TAVOFHOSTGet2Hash(hosts), 2000);
-}
-
-TEST_F(Discovery, AListThatIsNotOursIsNotRead)
-{
-    test::Owned<TLIBSZHASH> hosts = test::HashOf({});
-    test::ScratchDir elsewhere;
-    const std::string secret = elsewhere / "list";
-    WriteFile(secret, "1,240,host,10.0.0.5,x\n");
-    std::filesystem::create_symlink(secret, kTaken);
-    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts), 0);
-    EXPECT_EQ(TLIBErrGet(), ERR_OPEN_FAILED);
-    std::filesystem::remove(kTaken);
-    ASSERT_EQ(::mkfifo(kTaken, 0666), 0);
-    EXPECT_EQ(TAVOFHOSTGet2Hash(hosts), 0) << "and it does not wait";
-    std::filesystem::remove(kTaken);
-    WriteFile(kTaken, "1,240,host,10.0.0.5,x\n");
-    if (::chown(kTaken, 1000, 1000) == 0) {
-        EXPECT_EQ(TAVOFHOSTGet2Hash(hosts), 0) << "another user's";
-    }
-    EXPECT_TRUE(std::filesystem::exists(secret));
 }
 
 }  // namespace
