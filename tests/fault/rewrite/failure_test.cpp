@@ -53,6 +53,28 @@ TEST(FailingCalls, ReturnTheirCodes)
     EXPECT_EQ(test::OpenDescriptors(), descriptors);
 }
 
+TEST(FailingCalls, OfReadersAreReported)
+{
+    const test::ScratchDir dir;
+    const std::string file = dir / "file";
+    const char *const path = file.c_str();
+    test::WriteFile(file, kOldText);
+    test::Owned<TLIBSZHASH> hash = test::HashOf({});
+    test::Owned<TLIBSZLIST> list = test::ListOf({});
+    const auto fails = [](const char *module, int result) {
+        EXPECT_EQ(result, -1) << module;
+        EXPECT_EQ(LastFault(), (Fault{ERR_READ_FAILED, module}));
+    };
+    test::FailCalls(Call::read, EIO);
+    fails("file_get_keys", TLIBFileGetKeys(path, nullptr, hash, "="));
+    fails("file_get_section", TLIBFileGetSection(path, "net", hash));
+    fails("file_enum_section", TLIBFileEnumSection(path, list));
+    fails("file_read_lines", TLIBFileReadLines(path, list));
+    fails("file_append_key", TLIBFileAppendKey(path, "added", "v", nullptr));
+    test::FailCalls(Call::none, 0);
+    EXPECT_EQ(test::ReadFile(file), kOldText);
+}
+
 TEST(FailingCalls, OfAnAppendTakeItBack)
 {
     const test::ScratchDir dir;

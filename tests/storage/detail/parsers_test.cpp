@@ -9,6 +9,7 @@
 #include "storage/detail/device_name.h"
 #include "storage/detail/disk_path.h"
 #include "storage/detail/drive_page.h"
+#include "storage/detail/member_node.h"
 #include "storage/detail/proc_partitions.h"
 #include "storage/detail/sfdisk_line.h"
 #include "storage/detail/usb_id.h"
@@ -240,6 +241,19 @@ TEST(UsbId, FourDigits)
     EXPECT_EQ(tavo::ParseUsbId("05ac\n"), 0x05ACu);
     for (const char *bad : {"", "5ac", "05acx", "0x5a", "05ac1", " 5ac"})
         EXPECT_FALSE(tavo::ParseUsbId(bad)) << bad;
+}
+
+// The kernel's numbers of disks: sixteen to a major number, in three runs of them.
+TEST(ScsiName, CountsOverTheThreeRuns)
+{
+    const struct {
+        unsigned major_number, minor_number;
+        const char *name;
+    } rows[] = {{8, 0, "sda"},    {8, 255, "sdp15"},  {65, 0, "sdq"}, {65, 161, "sdaa1"}, {71, 240, "sddx"},
+                {128, 0, "sddy"}, {135, 240, "sdiv"}, {8, 256, ""},   {9, 0, ""},         {64, 0, ""},
+                {72, 0, ""},      {127, 0, ""},       {136, 0, ""},   {253, 0, ""}};
+    for (const auto &row : rows)
+        EXPECT_EQ(tavo::ScsiName(row.major_number, row.minor_number), row.name) << row.major_number;
 }
 
 }  // namespace
