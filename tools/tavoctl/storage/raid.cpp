@@ -197,8 +197,7 @@ on it use the room.
 tavoctl raid grow --wait md2 sde3
 tavoctl raid grow md2)");
     raid.Add("migrate", changes | destroys, RaidMigrate, R"(Turns a RAID 5 into a RAID 6 with a new member, which is
-rebuilt onto in the background. With more new members it gets as many slots as these are, minus 1,
-and fewer than it has then are refused; usually one is right. What is on them is lost.
+rebuilt onto in the background. What is on it is lost. `raid grow` adds others afterwards.
 
 tavoctl raid migrate md2 sde3)");
     raid.Add("stop", changes | destroys, RaidHalt, R"(Stops an array; its members keep their superblocks, so

@@ -88,15 +88,15 @@ uint64_t RoomBeforeData(const std::string &member)
 
 // The KiB by which the data of each member moves towards its beginning when it is spread over more of them; 0 for levels
 // whose data does not move.
-uint64_t ReshapeDistance(const RAIDINFO &array, int level, int old_slots, int new_slots)
+uint64_t ReshapeDistance(const RAIDINFO &array, int slots)
 {
-    if ((level != RAID_LEVEL_5 && level != RAID_LEVEL_6) || old_slots == new_slots)
+    if (array.fLevel != RAID_LEVEL_5 && array.fLevel != RAID_LEVEL_6)
         return 0;
-    const int parity = RAIDParityDiskCount(level, old_slots);
-    const int data = old_slots - parity;
+    const int parity = RAIDParityDiskCount(array.fLevel, array.nSlot);
+    const int data = array.nSlot - parity;
     const auto chunk =
         std::strtoull(KernelText(ArrayFile(array.szPath, "chunk_size")).value_or("").c_str(), nullptr, 10);
-    return chunk / 1024 * static_cast<uint64_t>(std::lcm(data, new_slots - parity) / data);
+    return chunk / 1024 * static_cast<uint64_t>(std::lcm(data, slots - parity) / data);
 }
 
 // With enough room before the data it never moves onto what has not been moved yet. Without it mdadm keeps a copy of the
@@ -160,7 +160,7 @@ void GrowSlots(Call &call, const RAIDINFO &array, const std::vector<std::string>
 {
     const std::string name = array.szPath;
     const int slots = array.nSlot + static_cast<int>(paths.size());
-    const uint64_t distance = ReshapeDistance(array, array.fLevel, array.nSlot, slots);
+    const uint64_t distance = ReshapeDistance(array, slots);
     RefuseUnsafeReshape(array, distance, attempted);
     RefuseTwice(paths, attempted);
     RefuseUsed(paths, attempted);
@@ -291,22 +291,13 @@ Action RaidGrow(Arguments &in)
 Action RaidMigrate(Arguments &in)
 {
     const auto word = in.Text("ARRAY", array_kind, array_help);
-    const auto words = in.Texts("MEMBER", device_kind, member_help);
+    const auto member = in.Text("MEMBER", device_kind, member_help);
     return [=](Call &call) {
         const Array array = ReadArray(ArrayPath(*word));
         const std::string attempted = std::string("turn ") + array->szPath + " into a RAID 6";
         FailIf(array->fLevel != RAID_LEVEL_5, attempted, "it is a " + LevelText(array->fLevel));
-        const std::vector<std::string> paths = DevicePaths(*words);
+        const std::vector<std::string> paths = {DevicePath(*member)};
         RefuseUsed(paths, attempted);
-        if (paths.size() > 1) {  // the level cannot be changed back when the other members do not fit
-            const int slots = array->nSlot + 1;
-            const int wanted = static_cast<int>(paths.size()) - 1;
-            FailIf(wanted < slots, attempted,
-                   "its slots become the new members minus 1, and " + std::to_string(wanted) + " is fewer than the " +
-                       std::to_string(slots) + " that it will have",
-                   "name one; raid grow adds others");
-            RefuseUnsafeReshape(*array, ReshapeDistance(*array, RAID_LEVEL_6, slots, wanted), attempted);
-        }
         call.Change(array->szPath, "level", LevelText(array->fLevel), LevelText(RAID_LEVEL_6));
         call.Change(array->szPath, "members", {}, paths);
         if (!call.Proceed(LossOf(paths)))
