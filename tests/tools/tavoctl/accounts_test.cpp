@@ -536,8 +536,16 @@ TEST_F(TavoctlAccounts, AListThatIsWrongAnywhereIsRefusedWhole)
         const char *reason;
     } inputs[] = {{"/dev/zero", "not a regular file"}, {dir / "fifo", "not a regular file"}, {dir / "large", "16 MiB"}};
     for (const auto &[path, reason] : inputs)
-        for (const char *family : {"user", "group"})
-            test::IsRefused({family, "import", path}, reason, 2);
+        for (const Words &words : {Words{"user", "import", path},
+                                   {"group", "import", path},
+                                   {"net", "apply", path},
+                                   {"state", "diff", path},
+                                   {"conf", "list", "--file", path},
+                                   {"conf", "get", "--file", path, "k"},
+                                   {"conf", "set", "--file", path, "k", "v"},
+                                   {"section", "list", "--file", path},
+                                   {"section", "get", "--file", path, "s"}})
+            test::IsRefused(words, reason, 2);
     EXPECT_EQ(test::ShellStatus(std::system("tavoctl user import - </dev/zero 2>/dev/null")), 2);
     EXPECT_EQ(test::ShellStatus(std::system("tr '\\0' x </dev/zero | tavoctl user import - 2>/dev/null")), 2);
 }

@@ -79,6 +79,21 @@ TEST(TavoctlContract, WithoutRightsAVerbSaysSo)
     EXPECT_GE(changing, 40);
     EXPECT_EQ(test::AsNobody([] { return Tavoctl({"user", "list"}); }).status, 5);
     EXPECT_EQ(test::AsNobody([] { return Tavoctl({"conf", "set", "runsamba", "no"}); }).status, 5);
+    // The file that may not be opened is the one that is meant. Root makes the folder of the locks.
+    ASSERT_EQ(std::system("rm -rf /tmp/lock; tavoctl lock run tavoinfo true"), 0);
+    test::WriteFile("/dev/sdq", "");
+    ASSERT_EQ(::chmod("/dev/sdq", 0600), 0);
+    for (const auto &[words, reason] : {std::pair(Words{"lock", "run", "tavoinfo", "true"}, "to open /tmp/lock, "),
+                                        {Words{"service", "status", "samba"}, "to open /tmp/lock, "},
+                                        {Words{"disk", "temperature", "--wake", "sdq"}, "Permission denied; "},
+                                        {Words{"disk", "health", "sdq"}, "Permission denied; "},
+                                        {Words{"state", "diff", "/etc/shadow"}, "Permission denied; "}}) {
+        const test::Ran ran = test::AsNobody([&words = words] { return Tavoctl(words); });
+        EXPECT_EQ(ran.status, 5) << ran;
+        EXPECT_THAT(ran.err, HasSubstr(std::string(reason))) << ran;
+        EXPECT_THAT(ran.err, HasSubstr("run it as root")) << ran;
+    }
+    ::unlink("/dev/sdq");
 }
 
 TEST(TavoctlContract, AWrongArgumentIsNamedWithWhatIsAllowed)

@@ -217,7 +217,11 @@ TEST(TavoctlFrame, AnAnswerThatCannotBeWrittenIsAFailure)
         return test::ShellStatus(std::system(("/usr/bin/tavoctl " + words + " " + redirections).c_str()));
     };
     WriteFile(file, "k=v\n");
-    EXPECT_EQ(status("conf list --file " + file, ">/dev/full 2>/dev/null"), 1);
+    for (const std::string &words : {"conf list --file " + file, std::string("--help"), std::string("conf --help"),
+                                     std::string("conf list --help"), std::string("--man-page")}) {
+        EXPECT_EQ(status(words, ">/dev/full 2>/dev/null"), 1) << words;
+        EXPECT_EQ(status(words, ">&- 2>/dev/null"), 1) << words;
+    }
     // Whatever the caller has closed, no message goes into a file, and a change that has nothing to say succeeds.
     for (int closed = 0; closed < 8; ++closed) {
         const std::string redirections = std::string(closed & 1 ? " 0<&-" : " 0</dev/null") +
@@ -251,6 +255,9 @@ TEST(TavoctlFrame, TablesShowTheChosenColumnsInTheWidthOfTheTerminal)
         for (const std::string &line : test::Lines(TavoctlAtTerminal(words).out))
             EXPECT_LE(line.size(), 81u) << line;  // with the carriage return
     }
+    // Only the widest column takes several lines.
+    EXPECT_THAT(TavoctlAtTerminal({"error", "list"}).out,
+                HasSubstr("\n0xD400  ERR_SERVICE_STD_ACTION       the script"));
 }
 
 TEST(TavoctlFrame, ColoursAndThePagerAreForTerminals)

@@ -237,7 +237,7 @@ TEST(TavoctlSettings, MissingFileIsNotFoundUnlessItIsToBeMade)
                                                  {"section", "remove", "--yes", "a"}})
         EXPECT_EQ(Tavoctl(In(dir / "none", words)).status, 3) << testing::PrintToString(words);
     EXPECT_THAT(dir.Names(), testing::IsEmpty());
-    EXPECT_EQ(Tavoctl(In(dir.Path(), {"conf", "get", "k"})).status, 1);
+    EXPECT_EQ(Tavoctl(In(dir.Path(), {"conf", "get", "k"})).status, 2);
     EXPECT_EQ(Tavoctl(In("/no/such/folder/f", {"conf", "set", "k", "v"})).status, 1);
 
     EXPECT_EQ(Tavoctl(In(dir / "conf", {"conf", "set", "k", "v"})).status, 0);

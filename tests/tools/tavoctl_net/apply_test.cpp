@@ -297,7 +297,7 @@ TEST_F(NetApply, HostileDocumentsAreRefusedWithThePlace)
     // After the version.
     const Row parts[] = {
         {R"("routers": [])", "routers: there is no such field"},
-        {R"("hostname": "a b")", "hostname: \"a b\" is not valid"},
+        {R"("hostname": "a b")", "hostname: \"a b\" is not valid; allowed: 1 to 15 letters"},
         {R"("hostname": null)", "hostname: cannot be null"},
         {R"("hostname": "a\u0000b")", "hostname: "},
         {R"("gateway": "192.0.2.999")", "gateway: "},

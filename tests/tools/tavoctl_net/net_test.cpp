@@ -68,6 +68,7 @@ TEST_F(Net, ShowsWhatWasSet)
         EXPECT_EQ(Tavoctl({"net", "dns", "192.0.2.53", "2001:db8::53"}).status, 0);
         EXPECT_EQ(Tavoctl({"net", "hostname", "attic"}).status, 0);
         EXPECT_EQ(Tavoctl({"net", "mtu", "eth0", "1400"}).status, 0);
+        EXPECT_THAT(Tavoctl({"net", "mtu", "eth0", "1400", "--json"}).out, HasSubstr(R"("changed": false)"));
         EXPECT_EQ(Tavoctl({"net", "ipv6", "eth0", "on"}).status, 0);
         EXPECT_EQ(Tavoctl({"net", "ipv6", "eth0", "2001:db8::20/64", "--gateway", "2001:db8::1"}).status, 0);
         const Ran shown = Tavoctl({"net", "show", "--json"});
@@ -113,21 +114,22 @@ TEST_F(Net, RefusesWhatCannotBe)
             {{"net", "set", "192.0.2.20/255.0.255.0"}, 2, "not a mask"},
             {{"net", "set", "--interface", "eth0;reboot", "192.0.2.20/24"}, 2, "allowed: 1 to 15 letters"},
             {{"net", "set", "--interface", "../../shadow", "192.0.2.20/24"}, 2, "allowed: 1 to 15 letters"},
-            {{"net", "set", "192.0.2.20/24", "--gateway", "router"}, 2, "no host can have that address"},
+            {{"net", "set", "192.0.2.20/24", "--gateway", "router"}, 2, "cannot take router as --gateway: allowed: "},
             {{"net", "set", "--try", "0", "192.0.2.20/24"}, 2, "--try"},
             {{"net", "gateway", "198.51.100.1"}, 1, "is it on the network of an interface?"},
-            {{"net", "gateway", "$(reboot)"}, 2, "ERR_INVALID_NETNAME"},
+            {{"net", "gateway", "$(reboot)"}, 2, "allowed: the IPv4 address of a host"},
             {{"net", "dns"}, 2, "none was named"},
             {{"net", "dns", "192.0.2.53", "ns.example"}, 2, "ERR_INVALID_NETNAME"},
             {{"net", "hostname", "0attic"}, 2, "ERR_INVALID_NETNAME"},
             {{"net", "mtu", "eth0", "67"}, 2, "a number from 68 to 65535"},
+            {{"net", "mtu", "eth9", "1400"}, 3, "there is no interface eth9"},
             {{"net", "ipv6", "eth0", "2001:db8::1/129"}, 2, "ERR_INVALID_NETNAME"},
             {{"net", "wol", "eth0", "on"}, 1, "ERR_OP_FAILURE"},
             {{"net", "bond", "--yes", "backup"}, 2, "it has no members"},
             {{"net", "bond", "--yes", "backup", "lo"}, 1, "it is not an Ethernet card"},
             {{"net", "bond", "backup", "eth0"}, 2, "there is no terminal to ask at"},
             {{"net", "confirm"}, 3, "none are on trial"},
-            {{"net", "check-address", "nonsense"}, 2, "ERR_BAD_PARAMETERS"},
+            {{"net", "check-address", "nonsense"}, 2, "cannot take nonsense as ADDRESS: allowed: "},
         };
         for (const auto &row : rows)
             test::IsRefused(row.words, row.says, row.status);

@@ -53,7 +53,7 @@ Action QuotaSwitch(Arguments &in)
     const auto volume = in.Number("VOLUME", "VOLUME", volume_help, 1, most_volumes);
     return [=](Call &call) {
         const MountedVolume mounted = FindVolume(static_cast<int>(**volume));
-        call.Change(mounted.path, "quotas", {}, on);
+        call.Change(mounted.path, "quotas", HasQuotas(mounted), on);
         if (!call.Proceed())
             return;
         if (on)

@@ -149,11 +149,13 @@ void BusyIf(bool condition, const std::string &attempted, const std::string &rea
 
 Failure SystemFailure(std::string attempted, int error)
 {
+    const bool denied = error == EACCES || error == EPERM;
     return {.attempted = std::move(attempted),
             .reason = std::strerror(error),
-            .status = error == ENOENT                     ? exit_not_found
-                      : error == EACCES || error == EPERM ? exit_denied
-                                                          : exit_failed};
+            .hint = denied ? "run it as root" : "",
+            .status = error == ENOENT ? exit_not_found
+                      : denied        ? exit_denied
+                                      : exit_failed};
 }
 
 Failure BusyFailure(std::string attempted, std::string reason, std::string hint)
@@ -172,13 +174,14 @@ Failure WithPermissions(Failure failure)
     }
     if (::geteuid() == 0 || failure.Status() == exit_usage || failure.Status() == exit_not_found)
         return failure;
-    std::vector<std::string> needed = {failure.path};
+    std::vector<std::pair<std::string, int>> needed = {{failure.path, R_OK}};
+    // The locks are in a folder of root's, and each is a file that only root may open.
     if (failure.code == ERR_LOCK_FAILED || failure.code == ERR_CREATE_FAILED)
-        needed.insert(needed.end(), {"/tmp/lock/.", "/tmp/lock"});
+        needed.emplace_back("/tmp/lock", W_OK);
     if (failure.code == ERR_LOCK_FAILED || failure.code == ERR_OPEN_FAILED || failure.code == ERR_READ_FAILED)
-        needed.insert(needed.end(), {"/etc/shadow", "/usr/tavo/etc/private/smbpasswd"});
-    for (const std::string &path : needed)
-        if (!path.empty() && ::eaccess(path.c_str(), R_OK) != 0 && errno == EACCES) {
+        needed.insert(needed.end(), {{"/etc/shadow", R_OK}, {"/usr/tavo/etc/private/smbpasswd", R_OK}});
+    for (const auto &[path, way] : needed)
+        if (!path.empty() && ::eaccess(path.c_str(), way) != 0 && errno == EACCES) {
             failure.reason = "no permission to open " + path;
             failure.hint = "run it as root";
             failure.status = exit_denied;

@@ -40,6 +40,15 @@ Descriptor::~Descriptor()
         ::close(fd_);
 }
 
+void RefuseNoText(const std::string &path)
+{
+    struct stat state = {};
+    if (::stat(path.c_str(), &state) != 0)
+        return;
+    RefuseIf(!S_ISREG(state.st_mode), "read " + path, "not a regular file");
+    RefuseIf(state.st_size > static_cast<off_t>(most_input), "read " + path, "larger than 16 MiB", "split it");
+}
+
 std::string ReadWhole(const std::string &path)
 {
     const std::string attempted = "read " + path;
@@ -49,8 +58,6 @@ std::string ReadWhole(const std::string &path)
     struct stat state = {};
     if (!file.IsOpen() || ::fstat(file.Get(), &state) != 0)
         throw SystemFailure(attempted, errno);
-    if (S_ISDIR(state.st_mode))
-        throw SystemFailure(attempted, EISDIR);
     RefuseIf(!S_ISREG(state.st_mode) && !(piped && (S_ISFIFO(state.st_mode) || S_ISSOCK(state.st_mode))), attempted,
              "not a regular file", "send other input through a pipe, as -");
     const auto refuse = [&] { throw UsageFailure(attempted, "larger than 16 MiB", "split it"); };

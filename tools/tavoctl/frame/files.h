@@ -25,6 +25,9 @@ class Descriptor {
     int fd_;
 };
 
+// Throws a Failure for a path to something else than a regular file, or to more than most_input bytes.
+void RefuseNoText(const std::string &path);
+
 // A regular file, or standard input for "-", which may be a pipe, too. Throws a Failure for anything else, and for more
 // than most_input bytes.
 std::string ReadWhole(const std::string &path);

@@ -17,20 +17,12 @@
 namespace tavoctl {
 namespace {
 
-Failure CannotRead(const std::string &path, const std::string &reason)
-{
-    return {.attempted = "read " + path, .reason = reason};
-}
-
 // True when it is there; a file that could not be made is a failure now, not when it is meant seriously.
 bool Exists(const std::string &path)
 {
     struct stat state = {};
-    if (::stat(path.c_str(), &state) == 0) {
-        if (!S_ISREG(state.st_mode))
-            throw CannotRead(path, "not a regular file");
+    if (::stat(path.c_str(), &state) == 0)
         return true;
-    }
     if (errno != ENOENT)
         throw SystemFailure("read " + path, errno);
     const std::filesystem::path folder = std::filesystem::absolute(path).parent_path();

@@ -41,6 +41,23 @@ int ReportUsage(const std::string &reason, const std::string &hint)
     return Report(UsageFailure("understand the command line", reason, hint), {});
 }
 
+// An answer that did not arrive is not an answer.
+void RefuseLostOutput()
+{
+    FailIf(!std::cout.flush(), "write to standard output", "it is full or closed");
+}
+
+int Show(const std::string &text)
+{
+    try {
+        std::cout << text;
+        RefuseLostOutput();
+        return exit_done;
+    } catch (const Failure &failure) {
+        return Report(failure, {});
+    }
+}
+
 // Before a verb runs: on this machine, by this user?
 void RefuseWithoutRights(const VerbEntry &entry, const Call &call)
 {
@@ -170,14 +187,12 @@ const Family *Program::Find(const std::string &name) const
 int Program::Run(std::vector<std::string> words) const
 {
     const std::string first = words.empty() ? "" : words[0];
-    if (IsHelp(first)) {
-        std::cout << Help();
-        return exit_done;
-    }
+    if (IsHelp(first))
+        return Show(Help());
     if (first == "--version")
         return Run({"version"});
     if (RunForTools(words))
-        return exit_done;
+        return Show("");
     const Family *family = Find(first);
     if (!family) {
         const std::string reason = first.empty() ? "a family is required" : "there is no family " + first;
@@ -186,10 +201,8 @@ int Program::Run(std::vector<std::string> words) const
     if (const VerbEntry *only = family->Find(""))
         return RunVerb(*family, *only, Tail(words, 1));
     const std::string second = words.size() > 1 ? words[1] : "";
-    if (IsHelp(second)) {
-        std::cout << FamilyHelp(*family);
-        return exit_done;
-    }
+    if (IsHelp(second))
+        return Show(FamilyHelp(*family));
     const VerbEntry *verb = second.empty() ? nullptr : family->Find(second);
     if (!verb) {
         const std::string reason = second.empty() ? "a verb is required" : "there is no verb " + first + " " + second;
@@ -226,10 +239,8 @@ int Program::RunVerb(const Family &family, const VerbEntry &entry, std::vector<s
     ReadyVerb verb(family, entry);
     try {
         try {
-            if (!verb.Declared().Parse(std::move(words))) {
-                std::cout << VerbHelp(family, entry);
-                return exit_done;
-            }
+            if (!verb.Declared().Parse(std::move(words)))
+                return Show(VerbHelp(family, entry));
         } catch (const Failure &) {
             call = verb.Called();
             throw;
@@ -244,8 +255,7 @@ int Program::RunVerb(const Family &family, const VerbEntry &entry, std::vector<s
         verb.Run()(call);
         if (entry.ReportsChanges() && (call.json || call.dry_run))
             PrintReport(call);
-        // An answer that did not arrive is not an answer.
-        FailIf(!std::cout.flush(), "write to standard output", "it is full or closed");
+        RefuseLostOutput();
         return call.status;
     } catch (const Failure &failure) {
         return Report(failure, call);

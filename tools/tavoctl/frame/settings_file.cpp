@@ -6,6 +6,7 @@
 #include "tavo_str.h"
 
 #include "frame/containers.h"
+#include "frame/files.h"
 #include "frame/held_locks.h"
 #include "frame/host.h"
 #include "frame/private_copy.h"
@@ -68,7 +69,9 @@ std::string SettingsFile::Path() const
 {
     RefuseIf(*defaults_ && *file_, "choose a file", "--file and --defaults name two");
     RefuseIf(!*file_ && must_be_named_, "choose a file", "--file PATH is required");
-    return file_->value_or(*defaults_ ? defaults_file : settings_file);
+    const std::string path = file_->value_or(*defaults_ ? defaults_file : settings_file);
+    RefuseNoText(path);
+    return path;
 }
 
 void SettingsFile::Change(Call &call, const std::function<void(const char *)> &edit, const std::string &question) const

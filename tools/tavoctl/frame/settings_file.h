@@ -15,7 +15,8 @@ class SettingsFile {
     static SettingsFile OfSystem(Arguments &in, unsigned trait);
     static SettingsFile Any(Arguments &in, unsigned trait);
 
-    // Throws a Failure when the options name no file, or two.
+    // Throws a Failure when the options name no file, or two, or something that is not a regular file or is larger than
+    // most_input.
     std::string Path() const;
 
     // Calls edit with the path of a private copy, and then, if that made a difference, with the path of the file, under

@@ -12,6 +12,7 @@
 #include <cctype>
 #include <cstdio>
 #include <cstdlib>
+#include <cwchar>
 #include <iterator>
 #include <memory>
 #include <new>
@@ -64,6 +65,15 @@ const char *ColourOf(const std::string &word)
         if (word == known)
             return colour;
     return nullptr;
+}
+
+// Columns of a terminal that a text takes.
+std::size_t WidthOf(const std::string &text)
+{
+    std::wstring wide(text.size(), L'\0');
+    const std::size_t count = std::mbstowcs(wide.data(), text.c_str(), wide.size());
+    const int width = count <= wide.size() ? ::wcswidth(wide.data(), count) : -1;
+    return width >= 0 ? static_cast<std::size_t>(width) : text.size();
 }
 
 // A table of libsmartcols that is as wide as the terminal.
@@ -174,6 +184,35 @@ void Table::Add(std::vector<Cell> row, int parent)
     rows_.push_back({std::move(row), parent});
 }
 
+// As few columns with free text as it takes for the table to fit the terminal, the widest first: a name or a code is hard
+// to read on two lines.
+std::vector<std::size_t> Table::Broken(const std::vector<std::size_t> &shown, bool tree) const
+{
+    constexpr std::size_t separator = std::size(column_separator) - 1;
+    constexpr std::size_t enough = 16;
+    std::vector<std::pair<std::size_t, std::size_t>> free;  // width and column
+    std::size_t total = 0;
+    for (const std::size_t i : shown) {
+        std::size_t width = Heading(columns_[i].name).size();
+        for (const Row &row : rows_)
+            width = std::max(width, WidthOf(row.cells[i].Text()));
+        total += width + separator;
+        const Kind kind = columns_[i].kind;
+        if ((kind == Kind::text || kind == Kind::texts || kind == Kind::any) && !(tree && i == shown[0]))
+            free.emplace_back(width, i);
+    }
+    std::sort(free.rbegin(), free.rend());
+    const std::size_t room = static_cast<std::size_t>(Terminal::Width()) + separator;
+    std::vector<std::size_t> broken;
+    for (const auto &[width, column] : free) {
+        if (total <= room)
+            break;
+        broken.push_back(column);
+        total -= std::min(total, width > enough ? width - enough : 0);
+    }
+    return broken;
+}
+
 std::string Table::Text(const TableStyle &style) const
 {
     std::vector<std::size_t> shown;
@@ -192,17 +231,14 @@ std::string Table::Text(const TableStyle &style) const
     }
 
     const bool tree = std::any_of(rows_.begin(), rows_.end(), [](const Row &row) { return row.parent >= 0; });
+    const std::vector<std::size_t> broken = Broken(shown, tree);
     Grid grid;
     if (!style.headings)
         grid.HideHeadings();
     for (const std::size_t i : shown) {
         const bool right = std::all_of(rows_.begin(), rows_.end(), [i](const Row &r) { return r.cells[i].IsNumber(); });
-        const bool free = columns_[i].kind == Kind::text || columns_[i].kind == Kind::texts ||
-                          (columns_[i].kind == Kind::any && !right);
-        grid.AddColumn(style.headings ? Heading(columns_[i].name) : "", (tree && i == shown[0] ? SCOLS_FL_TREE
-                                                                         : free                ? SCOLS_FL_WRAP
-                                                                                               : 0) |
-                                                                            (right ? SCOLS_FL_RIGHT : 0));
+        const int flag = tree && i == shown[0] ? SCOLS_FL_TREE : Contains(broken, i) && !right ? SCOLS_FL_WRAP : 0;
+        grid.AddColumn(style.headings ? Heading(columns_[i].name) : "", flag | (right ? SCOLS_FL_RIGHT : 0));
     }
     std::vector<libscols_line *> lines;
     for (const Row &row : rows_) {

@@ -35,6 +35,8 @@ class Table {
         std::vector<Cell> cells;
         int parent;
     };
+    std::vector<std::size_t> Broken(const std::vector<std::size_t> &shown, bool tree) const;
+
     std::vector<ColumnFacts> columns_;
     std::vector<Row> rows_;
 };

@@ -1,4 +1,5 @@
 // tavoctl net: the state of the network, and single settings of it.
+#include "tavo_error.h"
 #include "tavo_net.h"
 
 #include "families.h"
@@ -6,6 +7,7 @@
 #include "frame/files.h"
 #include "network/net_card.h"
 #include "network/net_document.h"
+#include "network/net_text.h"
 #include "network/net_verbs.h"
 
 #include <algorithm>
@@ -35,8 +37,33 @@ const ArgumentKind interface_kind = {
     .sample = "eth77",
     .wrong = "../eth0",
 };
+const ArgumentKind ipv4_kind = {
+    .name = "IPv4 address",
+    .allowed = "the IPv4 address of a host, such as 192.0.2.1",
+    .valid = [](const std::string &text) { return NormalIpv4(text).has_value(); },
+    .code = ERR_INVALID_NETNAME,
+    .sample = "192.0.2.77",
+    .wrong = "nonsense",
+};
 
 namespace {
+
+constexpr ArgumentKind server_kind = {
+    .name = "address",
+    .allowed = "the IPv4 or IPv6 address of a host, such as 192.0.2.53",
+    .valid = [](const std::string &text) { return NormalServer(text).has_value(); },
+    .code = ERR_INVALID_NETNAME,
+    .sample = "192.0.2.53",
+    .wrong = "nonsense",
+};
+constexpr ArgumentKind hostname_kind = {
+    .name = "host name",
+    .allowed = "1 to 15 letters, digits, \"-\" and \"_\", with a letter first",
+    .valid = [](const std::string &text) { return NormalHostname(text).has_value(); },
+    .code = ERR_INVALID_NETNAME,
+    .sample = "nemo",
+    .wrong = "a b",
+};
 
 // Of the appliance as a whole.
 struct NetFacts {
@@ -135,7 +162,7 @@ Action NetShow(Arguments &in)
 
 Action NetGateway(Arguments &in)
 {
-    const auto address = in.Text("ADDRESS", any_text, "of the router");
+    const auto address = in.Text("ADDRESS", ipv4_kind, "of the router");
     return [=](Call &call) {
         // It is stored, too, so that the change is made in any case.
         call.Change("network", "gateway", PresentNet().live_gateway, *address);
@@ -148,26 +175,24 @@ Action NetGateway(Arguments &in)
 Action NetDns(Arguments &in)
 {
     const auto none = in.Flag("--none", "no name server at all");
-    const auto addresses = in.Texts("ADDRESS", any_text, "of a name server", 0);
+    const auto addresses = in.Texts("ADDRESS", server_kind, "of a name server", 0);
     return [=](Call &call) {
         RefuseIf(*none != addresses->empty(), "set the name servers",
                  *none ? "there are some, and --none" : "none was named",
                  "name them in the order in which they are asked, or use --none");
         call.Change("network", "dns", PresentNet().dns, *addresses);
         if (call.Proceed())
-            Must(TAVONetDNSSet(StringList(*addresses).Get()) == 0, "set the name servers",
-                 "a name server is an IPv4 or IPv6 address");
+            Must(TAVONetDNSSet(StringList(*addresses).Get()) == 0, "set the name servers");
     };
 }
 
 Action NetHostname(Arguments &in)
 {
-    const auto name = in.Text("NAME", any_text, "the new host name");
+    const auto name = in.Text("NAME", hostname_kind, "the new host name");
     return [=](Call &call) {
         call.Change("network", "hostname", PresentNet().hostname, *name);
         if (!call.dry_run)
-            Must(TAVOLnxSetHostname(name->c_str()) == 0, "name this appliance " + *name,
-                 "allowed: 1 to 15 letters, digits, \"-\" and \"_\", with a letter first");
+            Must(TAVOLnxSetHostname(name->c_str()) == 0, "name this appliance " + *name);
     };
 }
 
@@ -176,10 +201,12 @@ Action NetMtu(Arguments &in)
     const auto interface = in.Text("INTERFACE", interface_kind, interface_help);
     const auto bytes = in.Number("BYTES", "BYTES", "68 to 65535", 68, 65535);
     return [=](Call &call) {
-        call.Change(*interface, "mtu", {}, **bytes);
+        const std::string attempted = "set the MTU of " + *interface + " to " + std::to_string(**bytes);
+        const TAVONETCARD card = CardNamed(attempted, *interface);
+        const int stored = TAVOGetMTUSetting(card.szInterface);
+        call.Change(*interface, "mtu", card.nMtu == **bytes ? stored : card.nMtu, **bytes);
         if (call.Proceed())
-            Must(TAVONetSetMTUValue(interface->c_str(), static_cast<int>(**bytes)) == 0,
-                 "set the MTU of " + *interface + " to " + std::to_string(**bytes),
+            Must(TAVONetSetMTUValue(card.szInterface, static_cast<int>(**bytes)) == 0, attempted,
                  HintFor{ERR_OP_FAILURE, "the card does not take it"});
     };
 }
@@ -197,7 +224,7 @@ Action NetRefresh(Arguments &)
 Action NetCheckAddress(Arguments &in)
 {
     const auto wanted = in.Option("--interface", "NAME", interface_kind, "that would have the address (the first one)");
-    const auto address = in.Text("ADDRESS", any_text, "an IPv4 address");
+    const auto address = in.Text("ADDRESS", ipv4_kind, "an IPv4 address");
     return [=](Call &call) {
         const std::string attempted = "check " + *address;
         const std::string interface = *wanted ? **wanted : std::string(FirstCard(attempted).szInterface);

@@ -24,32 +24,38 @@ constexpr char interface_pattern[] = "^[A-Za-z0-9_.:-]{1,15}$";
 }  // namespace
 
 const std::vector<NetItem> net_items = {
-    {"hostname", NetItem::text, false, "", "^[A-Za-z_][A-Za-z0-9_-]{0,14}$", "of the appliance", NormalHostname},
+    {"hostname", NetItem::text, false, "", "^[A-Za-z_][A-Za-z0-9_-]{0,14}$", "of the appliance", NormalHostname,
+     "1 to 15 letters, digits, \"-\" and \"_\", with a letter first"},
     {"gateway", NetItem::text, true, "", ipv4_pattern, "the IPv4 router, while the first card has a static address",
-     NormalIpv4},
+     NormalIpv4, "the IPv4 address of a host"},
     {"dns", NetItem::texts, false, "", any_address_pattern, "the name servers, in the order in which they are asked",
-     NormalServer},
+     NormalServer, "the IPv4 or IPv6 address of a host"},
     {"search", NetItem::texts, false, "search", "^[A-Za-z0-9.-]{1,255}$", "domains in which a short name is looked up",
-     NormalDomain},
+     NormalDomain, "the name of a domain"},
 };
 
 const std::vector<NetItem> card_items = {
-    {"bond", NetItem::text, false, "bonds", "^(lacp|adaptive|backup)$", "how the members work together",
-     NormalBondMode},
-    {"members", NetItem::texts, false, "bonds", interface_pattern, "the cards of a bond", NormalInterface},
-    {"parent", NetItem::text, false, "vlans", interface_pattern, "the interface that carries a VLAN", NormalInterface},
-    {"vlan", NetItem::number, false, "vlans", "", "the number of the VLAN", nullptr, 1, 4094},
-    {"mode", NetItem::text, false, "", "^(dhcp|static|none)$", "where the address comes from", NormalCardMode},
+    {"bond", NetItem::text, false, "bonds", "^(lacp|adaptive|backup)$", "how the members work together", NormalBondMode,
+     "lacp, adaptive or backup"},
+    {"members", NetItem::texts, false, "bonds", interface_pattern, "the cards of a bond", NormalInterface,
+     "the name of an interface"},
+    {"parent", NetItem::text, false, "vlans", interface_pattern, "the interface that carries a VLAN", NormalInterface,
+     "the name of an interface"},
+    {"vlan", NetItem::number, false, "vlans", "", "the number of the VLAN", nullptr, "", 1, 4094},
+    {"mode", NetItem::text, false, "", "^(dhcp|static|none)$", "where the address comes from", NormalCardMode,
+     "dhcp, static or none"},
     {"address", NetItem::text, true, "", ipv4_network_pattern, "of a static card, with the length of its mask",
-     NormalIpv4Card},
+     NormalIpv4Card, "the IPv4 address of a host with the length of its network, 192.0.2.10/24"},
     {"more_addresses", NetItem::texts, false, "addresses", ipv4_network_pattern, "further IPv4 addresses",
-     NormalIpv4Card},
+     NormalIpv4Card, "the IPv4 address of a host with the length of its network, 192.0.2.10/24"},
     {"ipv6", NetItem::truth, false, "", "", "whether the card speaks IPv6", nullptr},
-    {"ipv6_addresses", NetItem::texts, false, "", ipv6_network_pattern, "static ones", NormalIpv6Card},
-    {"ipv6_gateway", NetItem::text, true, "ipv6_gateway", ipv6_pattern, "the IPv6 router on this card", NormalIpv6},
+    {"ipv6_addresses", NetItem::texts, false, "", ipv6_network_pattern, "static ones", NormalIpv6Card,
+     "the IPv6 address of a host with the length of its network, 2001:db8::10/64"},
+    {"ipv6_gateway", NetItem::text, true, "ipv6_gateway", ipv6_pattern, "the IPv6 router on this card", NormalIpv6,
+     "the IPv6 address of a host"},
     {"routes", NetItem::texts, false, "routes", route_pattern, "\"NETWORK/LENGTH via ROUTER\", or without a router",
-     NormalRoute},
-    {"mtu", NetItem::number, false, "mtu", "", "in bytes", nullptr, 68, 65535},
+     NormalRoute, "NETWORK/LENGTH via ROUTER, or NETWORK/LENGTH"},
+    {"mtu", NetItem::number, false, "mtu", "", "in bytes", nullptr, "", 68, 65535},
     {"wake_on_lan", NetItem::truth, false, "wake_on_lan", "", "whether the card wakes the appliance", nullptr},
 };
 
@@ -70,7 +76,7 @@ std::string OneText(const NetItem &item, const Json &value, const std::string &p
     const std::string &given = value.get_ref<const std::string &>();
     const auto normal = given.find('\0') == given.npos ? item.normal(given) : std::nullopt;
     if (!normal)
-        RefuseDocument(place, "\"" + given.substr(0, 80) + "\" is not valid", item.about);
+        RefuseDocument(place, "\"" + given.substr(0, 80) + "\" is not valid", std::string("allowed: ") + item.allowed);
     return *normal;
 }
 

@@ -23,6 +23,7 @@ struct NetItem {
     const char *about;
     // Returns the canonical form of the text; nullopt when it is not valid.
     std::optional<std::string> (*normal)(const std::string &);
+    const char *allowed = "";  // the valid texts, for people
     long least = 0;
     long most = 0;
 };

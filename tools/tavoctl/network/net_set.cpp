@@ -62,14 +62,12 @@ void ChangeCard(const WantedNet &wanted, const TAVONETCARD &before)
 Action NetSet(Arguments &in)
 {
     const auto interface = in.Option("--interface", "NAME", interface_kind, "which one (the first one)");
-    const auto gateway = in.Option("--gateway", "ADDRESS", any_text, "the default gateway, too");
+    const auto gateway = in.Option("--gateway", "ADDRESS", ipv4_kind, "the default gateway, too");
     const auto seconds = TrialOption(in);
     const auto no_probe = in.Flag("--no-probe", no_probe_help);
     const auto address = in.Text("ADDRESS", any_text, "\"dhcp\", or an address with its mask");
     return [=](Call &call) {
         WantedNet wanted = {WantedCard(*address), *address, *gateway};
-        if (*gateway && !BlTLIBIsIpAddr((*gateway)->c_str()))
-            throw UsageFailure("make " + **gateway + " the gateway", "no host can have that address");
         const TAVONETCARD before = CardNamed("change the address", interface->value_or(""));
         const std::string name = before.szInterface;
         Put(wanted.card.szInterface, name);

@@ -11,6 +11,7 @@ std::vector<std::string> InterfaceNames();
 
 std::vector<std::string> Ipv6Of(const std::string &interface);  // its addresses
 extern const ArgumentKind interface_kind;
+extern const ArgumentKind ipv4_kind;  // of a host
 inline constexpr char interface_help[] = "such as eth0";
 
 inline constexpr char no_probe_help[] = "do not ask by ARP first whether another host uses the address";

@@ -11,6 +11,7 @@
 
 #include <algorithm>
 #include <cctype>
+#include <cerrno>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -18,6 +19,7 @@
 
 #include <sys/stat.h>
 #include <sys/utsname.h>
+#include <unistd.h>
 
 namespace tavoctl {
 namespace {
@@ -181,8 +183,15 @@ bool MayRead(const std::string &disk, bool wake)
     return wake || PowerOf(disk) == Power::spinning;
 }
 
+void RefuseUnreadable(const std::string &device, const std::string &attempted)
+{
+    if (::eaccess(device.c_str(), R_OK) != 0 && errno == EACCES)
+        throw SystemFailure(attempted, EACCES);
+}
+
 void RefuseToWake(const std::string &disk, bool wake, const std::string &attempted)
 {
+    RefuseUnreadable(disk, attempted);
     const Power power = wake ? Power::spinning : PowerOf(disk);
     FailIf(power != Power::spinning, attempted,
            disk + (power == Power::standby ? " is in standby" : " does not report whether it sleeps"),

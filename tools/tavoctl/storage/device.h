@@ -46,7 +46,10 @@ bool Sleeps(const std::string &device);
 // A disk that does not tell may sleep.
 bool MayRead(const std::string &disk, bool wake);
 
-// Throws a Failure when reading the disk would wake it, unless wake is set.
+// Throws a Failure when the caller may not read a device: the library reports such a drive like one that does not answer.
+void RefuseUnreadable(const std::string &device, const std::string &attempted);
+
+// The same, and when reading the disk would wake it, unless wake is set.
 void RefuseToWake(const std::string &disk, bool wake, const std::string &attempted);
 
 // Throws a Failure when one of all disks is in standby, unless wake is set.

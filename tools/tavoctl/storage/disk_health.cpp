@@ -85,6 +85,7 @@ DiskHealth ReadHealth(const std::string &disk, bool wake)
 {
     const std::string attempted = "read the health of " + disk;
     DiskHealth health = {.disk = DeviceName(disk)};
+    RefuseUnreadable(disk, attempted);
     if (!MayRead(disk, wake)) {
         health.reason = "it is in standby, or does not tell whether it sleeps";
         return health;

@@ -105,6 +105,7 @@ std::vector<StoppedArray> StoppedArrays(bool wake)
     for (const std::string &name : DeviceNames()) {
         const std::string path = DevicePath(name);
         RAIDSUPERBLOCK superblock;
+        RefuseUnreadable(path, "read the superblock of " + path);
         if (name.starts_with("sd") && !taken.contains(path) && RAIDSBGet(path.c_str(), &superblock) == 1 &&
             superblock.szUuid[0] && !taken.contains(superblock.szUuid))
             TakeIn(arrays, path, superblock);
