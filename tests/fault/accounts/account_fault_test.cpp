@@ -112,7 +112,7 @@ class Faults : public testing::Test {
         const test::CapturedLog silence;
         int changing = 0;
         for (const Call &call : every_call::AccountFamily().calls) {
-            // Those that use the files and the stores behind them by themselves, each in one way.
+            // Those that use the files and the stores beneath them by themselves, each in one way.
             const std::string name = call.name;
             const char *const only = std::getenv("TAVO_CALL");
             if (!std::regex_match(name, kCalls) || (only && name != only))
