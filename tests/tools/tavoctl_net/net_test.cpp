@@ -69,6 +69,7 @@ TEST_F(Net, ShowsWhatWasSet)
         EXPECT_EQ(Tavoctl({"net", "hostname", "attic"}).status, 0);
         EXPECT_EQ(Tavoctl({"net", "mtu", "eth0", "1400"}).status, 0);
         EXPECT_THAT(Tavoctl({"net", "mtu", "eth0", "1400", "--json"}).out, HasSubstr(R"("changed": false)"));
+        EXPECT_THAT(Tavoctl({"net", "bond", "--yes", "none", "--json"}).out, HasSubstr(R"("changed": false)"));
         EXPECT_EQ(Tavoctl({"net", "ipv6", "eth0", "on"}).status, 0);
         EXPECT_EQ(Tavoctl({"net", "ipv6", "eth0", "2001:db8::20/64", "--gateway", "2001:db8::1"}).status, 0);
         const Ran shown = Tavoctl({"net", "show", "--json"});

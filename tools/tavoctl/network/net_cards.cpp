@@ -4,10 +4,13 @@
 #include "frame/containers.h"
 #include "frame/text.h"
 #include "network/net_card.h"
+#include "network/net_present.h"
 #include "network/net_verbs.h"
 
 #include <algorithm>
 #include <iterator>
+
+#include <unistd.h>
 
 namespace tavoctl {
 namespace {
@@ -136,7 +139,10 @@ Action NetBond(Arguments &in)
         for (const std::string &member : *members)
             Must(TAVONetLinkAggrOptSlsaveAdd(&record, member.c_str()) == 0, "take " + member + " into " + name,
                  HintFor{ERR_LINK_AGGR_TYPE, "it is not an Ethernet card"});
-        call.Change(name, "mode", {}, *mode);
+        TAVONETLINKAGGR now = {};  // where kernel and file do not agree, neither is how it is
+        const bool stored = ::access(InterfaceFileOf(name).c_str(), F_OK) == 0;
+        const bool agreed = TAVONetLinkAggrGet(name.c_str(), &now) == 0 && stored == (now.nMode != TAVO_NET_AGGR_NONE);
+        call.Change(name, "mode", agreed ? Cell(bond_modes[now.nMode]) : Cell(), *mode);
         call.Change(name, "members", MembersOfBond(name), *members);
         if (call.Proceed("The network stops while " + name + " changes. Go on?"))
             Must(TAVONetLinkAggrSet(&record) == 0, attempted);
