@@ -1,10 +1,10 @@
 // What mdadm, the LVM tools and /proc/mounts say: parsers read no further than the text, keep to what it plainly says, and
 // let no name through that a shell reads otherwise.
+#include "core/detail/mount_table.h"
 #include "input.h"
 #include "storage/detail/array_name.h"
 #include "storage/detail/lvm_line.h"
 #include "storage/detail/mdadm_examine.h"
-#include "storage/detail/mount_table.h"
 #include "storage/detail/volume_name.h"
 
 #include <algorithm>

@@ -11,7 +11,7 @@ namespace {
 void CheckVolumes(const std::string &mounts)
 {
     int before = 0;
-    for (const tavo::Volume &volume : tavo::ParseVolumes(mounts)) {
+    for (const tavo::Volume &volume : tavo::VolumesIn(tavo::ParseMounts(mounts))) {
         Check(volume.number > before, "volumes stand in the order of their numbers, each once");
         before = volume.number;
         Check(volume.path == "/volume" + std::to_string(volume.number), "a volume's path is its number's");
