@@ -4,20 +4,24 @@
 #include "service/detail/process_named.h"
 #include "service/detail/volume_list.h"
 
+#include <algorithm>
+
 using fuzz::Check;
 
 namespace {
 
 void CheckVolumes(const std::string &mounts)
 {
+    const std::vector<tavo::Mount> table = tavo::ParseMounts(mounts);
     int before = 0;
-    for (const tavo::Volume &volume : tavo::VolumesIn(tavo::ParseMounts(mounts))) {
+    for (const tavo::Volume &volume : tavo::VolumesIn(table)) {
         Check(volume.number > before, "volumes stand in the order of their numbers, each once");
         before = volume.number;
         Check(volume.path == "/volume" + std::to_string(volume.number), "a volume's path is its number's");
         Check(tavo::VolumeNumber(volume.path) == volume.number, "and leads back to it");
         Check(tavo::VolumeOf(volume.path + "/@database/x") == volume.path, "what lies below lies on it");
-        Check(mounts.find(volume.path) != std::string::npos, "nothing is mounted that the kernel did not name");
+        Check(std::any_of(table.begin(), table.end(), [&](const tavo::Mount &one) { return one.point == volume.path; }),
+              "nothing is mounted that the kernel did not name");
         tavo::KindOf(volume);
     }
 }
