@@ -16,13 +16,6 @@ namespace {
 
 namespace fs = std::filesystem;
 
-std::vector<std::string> WithBegin(const char *begin, std::vector<std::string> lines)
-{
-    for (std::string &line : lines)
-        line.insert(0, begin);
-    return lines;
-}
-
 // Its name, or its number when it has none.
 std::string TextOf(int code)
 {
@@ -129,15 +122,6 @@ void Story::End(const std::string &text)
     }
 }
 
-Story::Source CommandsOf(RecordedCommands &commands, const std::string &without)
-{
-    return [&commands, pattern = std::regex(without), is_whole = without.empty()] {
-        std::vector<std::string> lines = commands.Take();
-        std::erase_if(lines, [&](const std::string &line) { return !is_whole && std::regex_search(line, pattern); });
-        return WithBegin("run ", lines);
-    };
-}
-
 Story::Source LogOf(CapturedLog &log, int least)
 {
     return [&log, least] {
@@ -150,15 +134,6 @@ Story::Source LogOf(CapturedLog &log, int least)
                 lines.push_back((priority == LOG_ERR ? "log " : "log at " + std::to_string(priority) + " ") + texts[i]);
         }
         return lines;
-    };
-}
-
-Story::Source CallsOf(RecordedCalls &calls, const std::string &begin)
-{
-    return [&calls, begin] {
-        std::vector<std::string> lines = calls.Take();
-        std::erase_if(lines, [&](const std::string &line) { return !line.starts_with(begin); });
-        return WithBegin("call ", lines);
     };
 }
 

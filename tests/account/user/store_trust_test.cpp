@@ -363,38 +363,10 @@ TEST(StoreTrust, LookUpsWithoutRights)
         ::unlink(store.c_str());
     EXPECT_EQ(test::AsNobody(PublicAnswers), answers);
 
-    const auto code = [](int result) {
-        return result >= 0 ? 0 : TLIBErrGet();
-    };
-    EXPECT_EQ(test::AsNobody([&] {
-                  TAVOUSER *user = nullptr;
-                  const char *const doomed[] = {"alice"};
-                  const test::User record = test::MakeUser({.name = "new"});
-                  const TAVOUSER *const records[] = {record.get()};
-                  char *none[] = {nullptr};
-                  const char *const hashes[] = {"x"};
-                  const char *const digits[] = {"00000000000000000000000000000000"};
-                  TAVOGROUP group = {const_cast<char *>("new"), -1, none, 0, 0};
-                  const int codes[] = {
-                      code(TAVOUserGet("alice", &user)),
-                      code(TAVOUserGet("none", &user)),
-                      code(TAVOUserGetByUID(0, &user)),
-                      code(TAVOUserGetByUID(4711, &user)),
-                      code(TAVOUserCheckExpired("alice")),
-                      code(TAVOUserSetOne(nullptr, record.get())),
-                      code(TAVOUserDelete(doomed, 1)),
-                      code(TAVOUserSetPasswd(records, hashes, digits, digits, 1)),
-                      code(TAVOGroupSet(nullptr, &group)),
-                      code(TAVOGroupDelete(doomed, 1)),
-                      code(TAVOGroupDescSet("staff", "x")),
-                      TAVOBDbOpen(TAVO_USER_DB_NAME, O_RDWR | O_CREAT, 1) ? 0 : TLIBErrGet(),
-                  };
-                  std::string text;
-                  for (const int each : codes)
-                      text += std::to_string(each / 256) + " ";
-                  return text;
+    EXPECT_EQ(test::AsNobody([] {
+                  return std::to_string(TAVOBDbOpen(TAVO_USER_DB_NAME, O_RDWR | O_CREAT, 1) ? 0 : TLIBErrGet());
               }),
-              "3 29 3 29 3 3 3 3 3 3 3 3 ");
+              std::to_string(ERR_ACCESS_DENIED));
     EXPECT_NE(::access(TAVO_USER_DB_NAME, F_OK), 0) << "only root makes stores";
     EXPECT_TRUE(test::GetUser("alice"));
     EXPECT_EQ(test::AsNobody([&] {

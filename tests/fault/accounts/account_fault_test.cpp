@@ -2,11 +2,15 @@
 // ready and with stores that must be built: no crash, no leak; a success has the right answer and the new files in
 // every file that knows accounts, a failure says why and leaves the old ones.
 #include "account/known_everywhere.h"
+#include "account/user/as_nobody.h"
 #include "fault/every_call/call.h"
+#include "support/domain_entries.h"
 #include "support/failing_malloc.h"
+#include "support/story.h"
 #include "support/test.h"
 #include "support/traced_call.h"
 
+#include <array>
 #include <regex>
 
 #include <sys/mman.h>
@@ -77,7 +81,7 @@ class Faults : public testing::Test {
   protected:
     void SetUp() override
     {
-        test::StartKnownEverywhere();
+        ASSERT_NO_FATAL_FAILURE(test::StartKnownEverywhere());
         ASSERT_EQ(test::AddUser("zo\xC3\xAB"), 0);
         before_ = test::Everything();
         void *const shared =
@@ -94,10 +98,15 @@ class Faults : public testing::Test {
         test::PutBack(before_);
         ASSERT_TRUE(test::GetUser("bob"));
         ASSERT_GE(TAVOGroupTotalNum(1), 0);
-        for (const char *seal : {"/tmp/.db.user.seal", "/tmp/.db.group.seal"})
-            if (!ready)
-                ::unlink(seal);
+        if (!ready)
+            ForgetStores();
         *outcome_ = {};
+    }
+
+    static void ForgetStores()
+    {
+        for (const char *seal : {"/tmp/.db.user.seal", "/tmp/.db.group.seal"})
+            ::unlink(seal);
     }
 
     void Make(const Call &call, Trial::Watch watch, int failing_allocation = 0)
@@ -192,6 +201,96 @@ class Faults : public testing::Test {
     Report clean_ = {};
     Outcome *outcome_ = nullptr;
 };
+
+// A folder at that path, for as long as it lives.
+class Blocked {
+  public:
+    explicit Blocked(std::string path) : path_(std::move(path))
+    {
+        std::filesystem::create_directories(std::filesystem::path(path_).parent_path());
+        if (::access(path_.c_str(), F_OK) == 0)
+            std::filesystem::rename(path_, path_ + ".away");
+        std::filesystem::create_directories(path_ + "/in");
+        std::filesystem::permissions(path_, std::filesystem::perms(0700));
+    }
+    ~Blocked()
+    {
+        std::filesystem::remove_all(path_);
+        if (::access((path_ + ".away").c_str(), F_OK) == 0)
+            std::filesystem::rename(path_ + ".away", path_);
+    }
+    Blocked(const Blocked &) = delete;
+    Blocked &operator=(const Blocked &) = delete;
+
+  private:
+    const std::string path_;
+};
+
+// What each call says otherwise when one thing of the appliance is broken, or when its caller has no rights. A failure has
+// changed nothing.
+TEST_F(Faults, EachCallSaysWhatIsBroken)
+{
+    if (!test::CanBecomeNobody())
+        GTEST_SKIP() << "only one user id is mapped here";
+    const struct {
+        const char *what;
+        std::vector<const char *> blocked;
+        std::vector<std::array<const char *, 3>> entries;  // of the stores: key and value
+        bool is_nobody = false;
+    } rows[] = {
+        {"without rights", {}, {}, true},
+        {"without rights, and no files", {"/etc/passwd", "/etc/group"}, {}, true},
+        {"no locks", {"/tmp/lock/lock_pw", "/tmp/lock/lock_gr"}, {}},
+        {"no lock of the system", {"/etc/.pwd.lock"}, {}},
+        {"no files", {"/etc/passwd", "/etc/group"}, {}},
+        {"no settings", {"/etc.defaults/tavoinfo.conf"}, {}},
+        {"no room for new files", {"/etc/shadow.tmp", "/etc/group_tmp"}, {}},
+        {"no marker", {"/etc/.tavoaccount.commit"}, {}},
+        {"names", {}, {{TAVO_USER_DB_NAME, "ALICE", "alice"}, {TAVO_GROUP_DB_NAME, "STAFF", "staff"}}},
+        {"other stores", {}, {{TAVO_USER_DB_SHADOW, "ALICE", "alice"}, {TAVO_GROUP_DB_DESC, "STAFF", "staff"}}},
+        {"mail", {}, {{TAVO_USER_DB_MISC, "ALICE", "alice"}, {TAVO_GROUP_DB_DESC, "STAFF", "staff:a\nb"}}},
+        {"Samba", {}, {{TAVO_USER_DB_SMB, "ALICE", "alice"}, {TAVO_USER_DB_UID, "001025", "NONE"}}},
+    };
+    test::CapturedLog log;
+    test::Story story{TEST_GOLDEN, {test::LogOf(log, LOG_NOTICE)}};
+    story.Mask("0x4000, errno=[0-9]+", "0x4000, errno=...");  // no call of the system's failed
+    const std::regex pure(
+        "TAVO(BDb|Unit|User(Alloc|Free|Exp|Is|Rand|Remove)|Group(Alloc|Free)|.*Quota(Init|Off|Fmt)).*");
+    for (const auto &row : rows) {
+        story.Head(row.what);
+        for (const Call &call : every_call::AccountFamily().calls) {
+            if (call.name[0] != 'T' || std::regex_match(call.name, pure))
+                continue;
+            const auto make = [&](bool broken) {
+                ForgetStores();
+                Begin(true);
+                for (const auto &[store, key, value] : row.entries)
+                    if (broken)
+                        test::PutEntry(store, key, value);
+                std::vector<std::unique_ptr<Blocked>> blocked;
+                for (const char *path : row.blocked)
+                    if (broken)
+                        blocked.push_back(std::make_unique<Blocked>(path));
+                if (!broken || !row.is_nobody) {
+                    Make(call, Trial::Watch::nothing);
+                } else {
+                    test::AsNobody([&] { return Make(call, Trial::Watch::nothing), ""; });
+                    TLIBErrSetEx(outcome_->report.code, "nobody", 0);
+                }
+                return outcome_->report;
+            };
+            const Report clean = make(false);
+            const Report report = make(true);
+            if (report.failed == clean.failed && report.code == clean.code && !std::strcmp(report.text, clean.text))
+                continue;
+            story.Tell(call.name, [&] { return make(true).failed ? -1 : 0; });
+            if (report.failed)
+                EXPECT_EQ(test::Difference(test::Everything(), before_), "") << row.what << ": " << call.name;
+            else
+                story.Show("answer", report.text);
+        }
+    }
+}
 
 TEST_F(Faults, EveryAllocation)
 {
