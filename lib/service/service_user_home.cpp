@@ -8,7 +8,6 @@
 #include "service/detail/data_folder.h"
 
 #include <cerrno>
-#include <string>
 
 #include <fcntl.h>
 #include <pwd.h>

@@ -7,7 +7,6 @@
 #include "packet.h"
 #include "report.h"
 
-#include <algorithm>
 #include <cerrno>
 #include <cstring>
 

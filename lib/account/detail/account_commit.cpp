@@ -7,8 +7,6 @@
 #include "account/detail/store_content.h"
 #include "core/detail/open_file.h"
 
-#include <algorithm>
-
 namespace tavo {
 namespace {
 

@@ -13,9 +13,7 @@
 #include "core/detail/owner.h"
 #include "core/detail/result.h"
 
-#include <string>
 #include <string_view>
-#include <vector>
 
 namespace tavo {
 

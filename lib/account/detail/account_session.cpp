@@ -7,7 +7,6 @@
 #include "core/detail/keep_fault.h"
 #include "core/detail/owner.h"
 
-#include <array>
 #include <numeric>
 #include <utility>
 

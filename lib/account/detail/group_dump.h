@@ -9,8 +9,6 @@
 #include "core/detail/result.h"
 #include "core/detail/where.h"
 
-#include <string>
-
 namespace tavo {
 
 class AccountTransaction;

@@ -2,7 +2,6 @@
 #ifndef TAVO_ACCOUNT_DETAIL_SECRET_TEXT_H
 #define TAVO_ACCOUNT_DETAIL_SECRET_TEXT_H
 
-#include <memory>
 #include <vector>
 
 #include <string.h>

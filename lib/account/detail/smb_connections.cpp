@@ -6,8 +6,6 @@
 #include "core/detail/shell_command.h"
 #include "core/detail/text_fields.h"
 
-#include <algorithm>
-
 namespace tavo {
 
 void EndSmbConnections(const std::string &user)

@@ -6,8 +6,6 @@
 #include "core/detail/setting_switch.h"
 #include "core/detail/strict_number.h"
 
-#include <cstring>
-
 namespace {
 
 constexpr int kLongestNumber = 32;

@@ -6,7 +6,6 @@
 #include "core/detail/open_file.h"
 
 #include <ctime>
-#include <string>
 
 namespace {
 

@@ -4,8 +4,6 @@
 
 #include "tavo_error.h"
 
-#include "core/detail/result.h"
-
 #include <optional>
 #include <type_traits>
 #include <utility>

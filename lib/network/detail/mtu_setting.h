@@ -3,7 +3,6 @@
 #define TAVO_NETWORK_DETAIL_MTU_SETTING_H
 
 #include <cstdio>
-#include <string_view>
 
 namespace tavo {
 

@@ -1,8 +1,6 @@
 // The local ports of /proc/net/tcp and /proc/net/udp.
 #include "network/detail/socket_table.h"
 
-#include "core/detail/text_fields.h"
-
 #include <charconv>
 
 namespace tavo {

@@ -5,8 +5,6 @@
 #include "core/detail/strict_number.h"
 #include "network/detail/mtu_setting.h"
 
-#include <cstring>
-
 extern "C" int TAVOGetMTUSetting(const char *szInterface)
 {
     char text[16];

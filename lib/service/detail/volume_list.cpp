@@ -2,7 +2,6 @@
 #include "service/detail/volume_list.h"
 
 #include "core/detail/strict_number.h"
-#include "core/detail/text_fields.h"
 
 #include <algorithm>
 #include <climits>

@@ -4,8 +4,6 @@
 
 #include "tavo_raid.h"
 
-#include <cstdint>
-
 #include <linux/major.h>
 #include <linux/raid/md_u.h>
 #include <sys/ioctl.h>

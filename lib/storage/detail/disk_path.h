@@ -5,7 +5,6 @@
 #include "tavo_disk.h"
 
 #include <string>
-#include <string_view>
 
 namespace tavo {
 

@@ -6,7 +6,6 @@
 #include "storage/detail/matching_paths.h"
 #include "storage/detail/open_disk.h"
 
-#include <algorithm>
 #include <optional>
 
 namespace tavo {

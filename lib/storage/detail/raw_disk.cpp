@@ -78,7 +78,7 @@ int HangsOnMarvell(const char *path, std::string &unreadable)
 
 Code RawDisk::Open(const char *path)
 {
-    const int code = OpenRawDisk(path, fd_);
+    const Code code = OpenRawDisk(path, fd_);
     if (code == 0)
         ChooseInterface(path);
     return code;

@@ -5,7 +5,6 @@
 #include "storage/detail/array_members.h"
 
 #include <cstdlib>
-#include <cstring>
 
 namespace {
 

@@ -16,7 +16,6 @@
 #include "storage/detail/open_disk.h"
 
 #include <cstring>
-#include <optional>
 #include <string>
 
 namespace {

@@ -4,7 +4,6 @@
 #include "frame/files.h"
 #include "service/service_state.h"
 
-#include <algorithm>
 #include <cerrno>
 #include <chrono>
 #include <map>

@@ -4,7 +4,6 @@
 #define TAVOCTL_ARGUMENTS_H
 
 #include <cstdint>
-#include <functional>
 #include <limits>
 #include <memory>
 #include <optional>

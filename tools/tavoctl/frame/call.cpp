@@ -4,7 +4,6 @@
 #include "frame/text.h"
 #include "frame/verb.h"
 
-#include <algorithm>
 #include <iostream>
 
 #include <unistd.h>

@@ -9,7 +9,6 @@
 
 #include <nlohmann/json.hpp>
 
-#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <iostream>

@@ -5,7 +5,6 @@
 #include <algorithm>
 #include <functional>
 #include <type_traits>
-#include <utility>
 #include <vector>
 
 namespace tavoctl {

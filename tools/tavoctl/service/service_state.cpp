@@ -11,8 +11,6 @@
 #include "frame/text.h"
 #include "storage/mounted_volumes.h"
 
-#include <algorithm>
-
 #include <strings.h>
 
 namespace tavoctl {

@@ -16,8 +16,6 @@
 #include "service/service_state.h"
 #include "storage/storage_tree.h"
 
-#include <algorithm>
-
 namespace tavoctl {
 namespace {
 

@@ -17,7 +17,6 @@
 #include "state/account_files.h"
 #include "storage/storage_tree.h"
 
-#include <algorithm>
 #include <climits>
 #include <cmath>
 #include <iostream>

@@ -7,7 +7,6 @@
 #include "storage/volume_groups.h"
 #include "storage/volume_verbs.h"
 
-#include <algorithm>
 #include <cerrno>
 #include <iostream>
 #include <sstream>

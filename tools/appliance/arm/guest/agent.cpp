@@ -14,7 +14,6 @@
 #include <ctime>
 #include <fstream>
 
-#include <fcntl.h>
 #include <sys/prctl.h>
 #include <unistd.h>
 

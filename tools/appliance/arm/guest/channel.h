@@ -1,7 +1,6 @@
 // The line between the agent in the guest and the host: frames of one type byte, a 32-bit length and a payload.
 #pragma once
 
-#include <optional>
 #include <string>
 #include <string_view>
 

@@ -2,7 +2,6 @@
 #include "enter.h"
 
 #include <cerrno>
-#include <cstdio>
 #include <cstdlib>
 
 #include <dirent.h>

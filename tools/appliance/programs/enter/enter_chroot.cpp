@@ -1,13 +1,10 @@
 // The form for machines that refuse namespaces: chroot alone, on a throw-away copy.
 #include "enter.h"
 
-#include <cerrno>
 #include <csignal>
 #include <cstdio>
-#include <cstring>
 #include <ctime>
 
-#include <fcntl.h>
 #include <sys/prctl.h>
 #include <sys/stat.h>
 #include <sys/sysmacros.h>
