@@ -29,7 +29,12 @@ enum class StoreContents { lines, index };
 // Returns whether an entry of a store is about a domain account. A description may hold a backslash, too.
 bool IsDomainEntry(std::string_view key, std::string_view value, StoreContents contents);
 
-// Keys and values of the stores end in a NUL.
+// Keys and values of the stores end in a NUL, so no text in them may have one.
+inline bool HasNul(std::string_view text)
+{
+    return text.find('\0') != text.npos;
+}
+
 inline std::string WithNul(std::string_view text)
 {
     return std::string(text).append(1, '\0');

@@ -115,7 +115,7 @@ Code AccountSession::Seal(Texts texts)
     Code code = 0;
     for (const std::unique_ptr<Btree> &store : stores_)
         if (store)
-            if (const int failed = store->Close())
+            if (const Code failed = store->Close())
                 code = failed;
     stores_.clear();
     if (code == 0)

@@ -24,7 +24,7 @@ namespace tavo {
 
 inline constexpr char kCommitMarker[] = "/etc/.tavoaccount.commit";
 
-// Where else on the appliance names of users and groups stand: bits.
+// Where else on the appliance users and groups are known by name: bits.
 enum Target : unsigned {
     kAccountFile = 0,
     kSambaLists = 1,

@@ -30,7 +30,7 @@ bool IsGroupDescription(std::string_view text);
 // The complete new entries of one group, already checked: storing them cannot be refused.
 struct GroupChange {
     std::string old_key;   // of the group that is replaced; empty when one is added
-    std::string old_name;  // as it stood
+    std::string old_name;  // as it was
     int32_t old_gid = -1;
     std::string key;
     GroupLine line;

@@ -7,7 +7,7 @@
 namespace tavo {
 
 // The keys and values that adding these groups would have stored, and those of the system's groups, whose lines are kept
-// as they are. Lines that are no group are left out; of two groups with one id the first has the index.
+// as they are. Lines that are not groups are left out; of two groups with one id the first has the index.
 std::vector<StoreEntries> GroupStoreEntries(std::string_view groups, std::string_view descriptions);
 
 extern const AccountKind kGroupKind;

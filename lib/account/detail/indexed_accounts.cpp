@@ -72,7 +72,7 @@ FileReview ReviewFile(const Btree &names, const AccountLines &lines, const Accou
     for (std::string_view rest = text; !rest.empty();) {
         const std::string_view whole = TakeLine(rest);
         const Result<NameAndId> account = lines.parse(whole);
-        const bool is_account = whole.find('\0') == whole.npos && account && !IsDomainName(account->name);
+        const bool is_account = !HasNul(whole) && account && !IsDomainName(account->name);
         if (!is_account || !seen.insert(account->name).second) {
             // Comments mean nothing to the system. A line may hold a hash, so the log has only its first field.
             if (!whole.empty() && !whole.starts_with('#'))

@@ -25,7 +25,7 @@ struct NameAndId {
 // How the lines of a family are read.
 struct AccountLines {
     Result<NameAndId> (*parse)(std::string_view line);
-    const char *path;  // the text file that they stand in
+    const char *path;  // the text file with their lines
     size_t key_size;
 };
 

@@ -1,4 +1,4 @@
-// The files of other programs in which users and groups stand by name.
+// The files of other programs that name users and groups.
 #include "account/detail/neighbour_files.h"
 
 #include "tavo_error.h"

@@ -1,4 +1,4 @@
-// The files of other programs in which users and groups stand by name, brought in line with a change.
+// The files of other programs that name users and groups, brought in line with a change.
 #ifndef TAVO_ACCOUNT_DETAIL_NEIGHBOUR_FILES_H
 #define TAVO_ACCOUNT_DETAIL_NEIGHBOUR_FILES_H
 

@@ -96,7 +96,7 @@ Code FillStore(const char *path, const StoreEntries &entries, int64_t sync_time)
     return code != 0 ? code : store->Close();
 }
 
-// The one that stood there is kept for a look at what went wrong, unless it held secrets or was not ours.
+// The old store is kept for a look at what went wrong, unless it held secrets or was not ours.
 void SetAside(const StoreRow &row)
 {
     const std::string backup = std::string(row.path) + ".bak";

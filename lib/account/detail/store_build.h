@@ -18,8 +18,7 @@ struct AccountKind {
     size_t name_store;  // the places of two of its stores: that of the accounts, and the index by id
     size_t id_store;
     size_t key_size;
-    std::vector<StoreEntries> (*entries)(
-        std::span<const std::string> texts);  // the entries of the stores, from the text files
+    std::vector<StoreEntries> (*entries)(std::span<const std::string> texts);  // of the stores, from the text files
 };
 
 inline StoreContents ContentsOf(const AccountKind &kind, size_t store)
@@ -37,9 +36,8 @@ inline Code CodeOfStores(Code code)
 bool ReadContent(const AccountKind &kind, StoreContent &out);
 
 // Completes a half-done commit, reads the text files and puts new stores in place of the old ones, whatever those are;
-// old ones that were root's and hold no secrets are kept as "NAME.bak". Fresh
-// entries of domain accounts stay. The locks must be held exclusively.
-// `texts` becomes what the text files looked like when they were read.
+// old ones that were root's and hold no secrets are kept as "NAME.bak". Fresh entries of domain accounts stay. The
+// locks must be held exclusively. `texts` becomes what the text files looked like when they were read.
 // 0, ERR_OPEN_FAILED, ERR_READ_FAILED, ERR_NOT_ENOUGH_SPACE, ERR_OUT_OF_MEMORY or ERR_RENAME_FAILED.
 Code BuildStores(const AccountKind &kind, std::string &texts);
 

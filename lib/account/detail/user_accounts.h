@@ -4,6 +4,7 @@
 
 #include "tavo_user.h"
 
+#include "account/detail/id_index.h"
 #include "account/detail/passwd_line.h"
 #include "account/detail/store_view.h"
 #include "core/detail/result.h"
@@ -16,6 +17,7 @@ namespace tavo {
 class AccountSession;
 struct UserChange;
 
+inline constexpr IdRange kUids{kCurrentUidKey, TAVO_USER_UID_MIN, TAVO_USER_UID_MAX, ERR_TOO_MANY_USERS};
 inline constexpr char kHomes[] = "/var/services/homes/";
 inline constexpr char kDefaultShell[] = "/bin/csh";
 

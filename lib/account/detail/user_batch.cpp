@@ -7,11 +7,6 @@
 #include "account/detail/user_change.h"
 
 namespace tavo {
-namespace {
-
-constexpr IdRange kUids{kCurrentUidKey, TAVO_USER_UID_MIN, TAVO_USER_UID_MAX, ERR_TOO_MANY_USERS};
-
-}  // namespace
 
 UserBatch::Outcome UserBatch::Apply(const char *old_name, const TAVOUSER *user)
 {

@@ -15,7 +15,7 @@ namespace tavo {
 // The complete new entries of one account, already checked: storing them cannot be refused.
 struct UserChange {
     std::string old_key;   // of the account that is replaced; empty when one is added
-    std::string old_name;  // as it stood
+    std::string old_name;  // as it was
     int32_t old_uid = -1;
     std::string old_hash;
     bool keep_index = false;  // root and admin keep the index entry that they have

@@ -16,7 +16,7 @@ struct UserTexts {
 };
 
 // The keys and values that adding these accounts would have stored, and those of system accounts, whose lines are kept
-// as they are. Lines that are no account are left out; of two accounts with one user id the first has the index.
+// as they are. Lines that are not accounts are left out; of two accounts with one user id the first has the index.
 std::vector<StoreEntries> UserStoreEntries(const UserTexts &texts);
 
 extern const AccountKind kUserKind;

@@ -1,14 +1,8 @@
 // Chooses the next free user id.
 #include "tavo_user.h"
 
-#include "account/detail/id_index.h"
+#include "account/detail/user_accounts.h"
 #include "core/detail/guard.h"
-
-namespace {
-
-constexpr tavo::IdRange kUids{tavo::kCurrentUidKey, TAVO_USER_UID_MIN, TAVO_USER_UID_MAX, ERR_TOO_MANY_USERS};
-
-}  // namespace
 
 extern "C" int TAVOUserDBGetFreeUid(TAVOUSERDB *pDb)
 {
@@ -16,7 +10,7 @@ extern "C" int TAVOUserDBGetFreeUid(TAVOUSERDB *pDb)
         return Fail(ERR_BAD_PARAMETERS);
     return Guard([&] {
         int32_t uid = -1;
-        const int code = tavo::FindFreeId(*tavo::Btree::Of(pDb->pUid), kUids, uid);
+        const tavo::Code code = tavo::FindFreeId(*tavo::Btree::Of(pDb->pUid), tavo::kUids, uid);
         return code == 0 ? uid : Fail(code);
     });
 }

@@ -40,7 +40,7 @@ std::vector<Doomed> Collect(const TAVOUSERDB &db, const char *const *names, int 
             continue;
         const tavo::Result<tavo::PasswdLine> account =
             key ? tavo::ReadPasswdLine(db, *key) : tavo::Result<tavo::PasswdLine>(ERR_KEY_NOT_FOUND);
-        const int code = account.Failure();
+        const tavo::Code code = account.Failure();
         if (code == ERR_KEY_NOT_FOUND) {
             Fail(ERR_NO_SUCH_USER);
             LogError("%s:%d User [%s] does not exist", names[i]);

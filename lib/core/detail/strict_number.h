@@ -17,6 +17,15 @@ std::optional<Number> StrictNumber(std::string_view text, int base = 10)
     return error == std::errc{} && end == text.data() + text.size() ? std::optional(number) : std::nullopt;
 }
 
+// The same for a place that has a variable already, which is zero then.
+template <class Number>
+bool ReadNumber(std::string_view text, Number &number, int base = 10)
+{
+    const auto read = StrictNumber<Number>(text, base);
+    number = read.value_or(0);
+    return read.has_value();
+}
+
 // The number that a text begins with; `otherwise` where there is none or it does not fit.
 template <class Number>
 Number LeadingNumber(std::string_view text, Number otherwise = 0, int base = 10) noexcept

@@ -31,14 +31,6 @@ std::string_view TakeField(std::string_view &line)
     return {begin, static_cast<size_t>(stop - begin)};
 }
 
-template <class Number>
-bool TakeNumber(std::string_view &line, Number &number)
-{
-    const auto read = StrictNumber<Number>(TakeField(line));
-    number = read.value_or(0);
-    return read.has_value();
-}
-
 }  // namespace
 
 bool PartitionsRow::IsWholeIdeDisk() const
@@ -55,7 +47,8 @@ bool PartitionsRow::IsWholeScsiDisk() const
 std::optional<PartitionsRow> ParsePartitionsRow(std::string_view line)
 {
     PartitionsRow row = {};
-    if (!TakeNumber(line, row.major) || !TakeNumber(line, row.minor) || !TakeNumber(line, row.blocks))
+    if (!ReadNumber(TakeField(line), row.major) || !ReadNumber(TakeField(line), row.minor) ||
+        !ReadNumber(TakeField(line), row.blocks))
         return std::nullopt;
     row.name = TakeField(line);
     return !row.name.empty() && TakeField(line).empty() ? std::optional(row) : std::nullopt;

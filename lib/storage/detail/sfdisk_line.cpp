@@ -9,22 +9,14 @@ namespace {
 
 constexpr size_t kReadable = 63;  // only so much of a line has ever been read; the name at its end is not needed
 
-template <class Number>
-bool ParseField(std::string_view field, Number &number, int base)
-{
-    const auto read = StrictNumber<Number>(field, base);
-    number = read.value_or(0);
-    return read.has_value();
-}
-
 }  // namespace
 
 std::optional<PartitionGeometry> ParseSfdiskLine(std::string_view line)
 {
     const auto fields = SplitFields(line.substr(0, kReadable));
     PartitionGeometry geometry = {};
-    if (fields.size() < 5 || !ParseField(fields[1], geometry.start, 10) || !ParseField(fields[3], geometry.count, 10) ||
-        !ParseField(fields[4], geometry.type, 16))
+    if (fields.size() < 5 || !ReadNumber(fields[1], geometry.start) || !ReadNumber(fields[3], geometry.count) ||
+        !ReadNumber(fields[4], geometry.type, 16))
         return std::nullopt;
     return geometry.start >= 0 && geometry.count >= 0 ? std::optional(geometry) : std::nullopt;
 }
