@@ -9,6 +9,7 @@
 
 #include <algorithm>
 #include <cstring>
+#include <functional>
 #include <string>
 #include <vector>
 
@@ -33,6 +34,7 @@ class ListModel {
 
     int Count() const { return static_cast<int>(items.size()); }
     int Free() const { return size - 24 - 4 * Count() - stored; }
+    int Used() const { return size - Free(); }
     bool IsSorted() const { return mode == 1 || mode == 16; }
     const Item &At(int i) const { return items[static_cast<size_t>(i)]; }
 
@@ -104,7 +106,6 @@ class ListModel {
         return -1;
     }
 
-  private:
     void MakeRoom(int bytes)
     {
         while (Free() < bytes)
@@ -166,18 +167,28 @@ class ListPair {
         return text;
     }
 
-    void CheckAll() const
+    void CheckAll() const { CheckList(list_, model_); }
+
+    static void CheckList(const TLIBSZLIST *list, const ListModel &model)
     {
-        Check(list_->nItem == model_.Count(), "count");
-        Check(list_->nSize == model_.size && list_->nFree == model_.Free(), "sizes");
-        Check(list_->fMode == model_.mode, "mode");
-        Check(list_->pszEmpty + 1 - list_->EndofFree == model_.stored && *list_->pszEmpty == 0, "stored bytes");
-        Check(static_cast<const void *>(list_->pszItem + list_->nItem) <= list_->EndofFree, "within the block");
-        for (int i = 0; i < list_->nItem; ++i)
-            Check(model_.At(i) == ItemOf(i), "item");
+        Check(list && list->nItem == model.Count(), "count");
+        Check(list->nSize == model.size && list->nFree == model.Free(), "sizes");
+        Check(list->fMode == model.mode, "mode");
+        Check(list->pszEmpty + 1 - list->EndofFree == model.stored && *list->pszEmpty == 0, "stored bytes");
+        Check(static_cast<const void *>(list->pszItem + list->nItem) <= list->EndofFree, "within the block");
+        for (int i = 0; i < list->nItem; ++i)
+            Check(list->pszItem[i] == model.At(i).text && IsHole(list, i) == model.At(i).hole, "item");
     }
 
-    ListModel::Item ItemOf(int i) const { return {list_->pszItem[i], list_->pszItem[i] == list_->pszEmpty}; }
+    static std::vector<ListModel::Item> ItemsOf(const TLIBSZLIST *list)
+    {
+        std::vector<ListModel::Item> items;
+        for (int i = 0; i < list->nItem; ++i)
+            items.push_back({list->pszItem[i], IsHole(list, i)});
+        return items;
+    }
+
+    static bool IsHole(const TLIBSZLIST *list, int i) { return list->pszItem[i] == list->pszEmpty; }
 
     void Inserts(int i, const std::string &text)
     {
@@ -240,9 +251,7 @@ class ListPair {
     // Equal items may be in any order. The model adopts the list's order once it is checked to be a valid one.
     void TakeOrder()
     {
-        std::vector<ListModel::Item> ordered;
-        for (int i = 0; i < list_->nItem; ++i)
-            ordered.push_back(ItemOf(i));
+        const std::vector<ListModel::Item> ordered = ItemsOf(list_);
         const auto in_order = [&](const auto &a, const auto &b) {
             return model_.Compare(a.text, b.text) < 0;
         };
@@ -269,28 +278,69 @@ class ListPair {
         }
     }
 
-    // Sets of two lists: their results are not modelled, only that the list is whole afterwards.
+    // Sets of two lists: the order of the first one, the comparison of the second one.
     void Combines()
     {
         TLIBSZLIST *other = PslTLIBSzListAlloc(0);
-        for (int i = Any(8); i > 0; --i)
-            TLIBSzListPush(&other, Text().c_str());
-        TLIBSzListSortItems(other, Any(2) + 16 * Any(2));
-        const int flags = Any(2) ? TLIB_SZLIST_NEW : 0;
+        ListModel b;
+        for (int i = Any(8); i > 0; --i) {
+            const std::string text = Text();
+            TLIBSzListPush(&other, text.c_str());
+            b.Insert(b.Count(), text);
+        }
+        b.mode = Any(2) + 16 * Any(2);
+        TLIBSzListSortItems(other, b.mode);
+        b.items = ItemsOf(other);
+        const bool is_new = Any(2);
         const int operation = Any(3);
+        const int flags = is_new ? TLIB_SZLIST_NEW : 0;
+        const TLIBSZLIST *const before = list_;
         TLIBSZLIST *result = operation == 0   ? PslTLIBSzListAnd(list_, other, flags)
                              : operation == 1 ? PslTLIBSzListOr(&list_, other, flags)
                                               : PslTLIBSzListSub(list_, other, flags);
-        if (result && flags)
+        CheckList(other, b);
+        if (model_.IsSorted() && b.IsSorted() && model_.mode != b.mode) {
+            Check(!result, "lists of different orders");
+        } else {
+            const auto is_wanted = [&](const ListModel::Item &item) {
+                return !item.hole && (operation == 1 || (b.Scan(item.text, b.mode == 16) >= 0) == (operation == 0));
+            };
+            ListModel expected = is_new ? ListModel() : model_;
+            if (is_new) {
+                expected.size = std::max(512, model_.Used() + (operation == 1 ? b.Used() : 0));
+                expected.mode = model_.mode;
+                for (const ListModel::Item &item : model_.items) {
+                    if (is_wanted(item))
+                        expected.items.push_back(expected.Store(item.text));
+                }
+            } else {
+                std::erase_if(expected.items, std::not_fn(is_wanted));
+            }
+            if (operation == 1)
+                Unites(expected, b);
+            Check(result == list_ ? !is_new : is_new && list_ == before, "the list of the result");
+            CheckList(result, expected);
+            if (!is_new)
+                model_ = expected;
+        }
+        if (is_new)
             TLIBSzListFree(result);
         TLIBSzListFree(other);
-        if (!flags) {
-            model_.size = list_->nSize;
-            model_.stored = static_cast<int>(list_->pszEmpty + 1 - list_->EndofFree);
-            model_.items.clear();
-            for (int i = 0; i < list_->nItem; ++i)
-                model_.items.push_back(ItemOf(i));
+    }
+
+    void Unites(ListModel &into, const ListModel &b) const
+    {
+        std::vector<std::string> missing;
+        int bytes = 0;
+        for (const ListModel::Item &item : b.items) {
+            if (item.hole || model_.Scan(item.text, b.mode == 16) >= 0)
+                continue;
+            missing.push_back(item.text);
+            bytes += static_cast<int>(item.text.size()) + 5;
         }
+        into.MakeRoom(bytes);
+        for (const std::string &text : missing)
+            into.Insert(into.Count(), text);
     }
 
     void Joins(const std::string &separator)

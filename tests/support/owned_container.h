@@ -22,17 +22,6 @@ inline Hash MakeHash(const PairMap &pairs, int string_bytes = 512)
     return hash;
 }
 
-// In the format of a settings file, in slot order.
-inline std::string Settings(const TLIBSZHASH *hash)
-{
-    std::string text;
-    for (int slot = 0; slot < hash->nSlot; ++slot) {
-        if (hash->slots[slot].pszKey)
-            text += hash->slots[slot].pszKey + std::string("=") + hash->slots[slot].pszValue + "\n";
-    }
-    return text;
-}
-
 // Becomes the container, or its address.
 template <class T>
 struct Owned {

@@ -1,10 +1,13 @@
-// Lists: published numbers, orders, sets, refusals. list_model_test checks the effects of the single operations.
+// Lists: published numbers, orders, refusals. The fuzzer's model, with random operations, checks what each of them does.
 #include "tavo_list.h"
 
+#include "fuzz/list_model.h"
 #include "support/container_text.h"
+#include "support/rounds.h"
 #include "support/test.h"
 
 #include <climits>
+#include <random>
 
 #include <malloc.h>
 
@@ -36,6 +39,16 @@ struct Refusal {
         return (call) == nullptr;                                                                                      \
     }
 
+TEST(ListModel, AgreesAfterEachOperation)
+{
+    std::vector<uint8_t> bytes(static_cast<size_t>(test::Rounds(8'000'000)));
+    std::generate(bytes.begin(), bytes.end(), std::mt19937(20260));
+    fuzz::Input input(bytes.data(), bytes.size());
+    fuzz::ListPair pair(input);
+    while (!input.Empty())
+        pair.Step();
+}
+
 TEST(ListAlloc, CountsInWordsOfTheAppliance)
 {
     const struct {
@@ -55,18 +68,6 @@ TEST(ListAlloc, CountsInWordsOfTheAppliance)
         EXPECT_EQ(list->pszEmpty + 1, reinterpret_cast<char *>(list.get()) + row.size + wider);
         EXPECT_EQ(list->EndofFree, list->pszEmpty + 1);
     }
-}
-
-TEST(ListInsert, GrowsAsOftenAsItTakes)
-{
-    List list(PslTLIBSzListAlloc(0));
-    EXPECT_EQ(Insert(list, 0, std::string(1000 - 5, 'x').c_str()), 0);
-    EXPECT_EQ(list->nSize, 1024);
-    EXPECT_EQ(list->nFree, 0) << "it just fits in twice the size";
-    const std::string large(100000, 'y');
-    EXPECT_EQ(Insert(list, 1, large.c_str()), 1);
-    EXPECT_EQ(list->nSize, 512 * 256);
-    EXPECT_EQ(list->pszItem[1], large);
 }
 
 TEST(ListInsert, FoldsBeyondAscii)
@@ -184,70 +185,6 @@ TEST(List, ABlockWithoutASizeIsRefused)
     broken->nSize = size;
     broken->nFree = free;
     EXPECT_EQ(Items(broken), (std::vector<std::string>{"a", "b"}));
-}
-
-TEST(ListSets, KeepTheOrderOfTheFirst)
-{
-    enum { kAnd, kOr, kSub };
-    const struct {
-        int operation;
-        Texts a;
-        int a_mode;
-        Texts b;
-        int b_mode;
-        Texts result;
-    } rows[] = {
-        {kAnd, {"c", "a", "b", "a"}, 0, {"a", "x", "c"}, 0, {"c", "a", "a"}},
-        {kSub, {"c", "a", "b", "a"}, 0, {"a", "x", "c"}, 0, {"b"}},
-        {kOr, {"c", "a"}, 0, {"z", "a", "y", "z"}, 0, {"c", "a", "z", "y", "z"}},
-        {kAnd, {"C", "a", "B"}, 0, {"c", "b", "X"}, 16, {"C", "B"}},
-        {kSub, {"C", "a", "B"}, 0, {"c", "b", "X"}, 16, {"a"}},
-        {kOr, {"C", "a"}, 0, {"c", "A", "X"}, 16, {"C", "a", "X"}},
-        {kAnd, {"c", "a", "B"}, 0, {"c", "b"}, 1, {"c"}},
-        {kAnd, {"a", "b", "b", "d"}, 1, {"b", "c", "d"}, 1, {"b", "b", "d"}},
-        {kSub, {"a", "b", "b", "d"}, 1, {"b", "c", "d"}, 1, {"a"}},
-        {kOr, {"b", "d"}, 1, {"a", "b", "e", "c"}, 1, {"a", "b", "c", "d", "e"}},
-        {kAnd, {"A", "b", "d"}, 16, {"a", "D"}, 16, {"A", "d"}},
-        {kSub, {"A", "b", "d"}, 16, {"a", "D"}, 16, {"b"}},
-        {kOr, {"b", "D"}, 16, {"c", "B", "a"}, 16, {"a", "b", "c", "D"}},
-        {kOr, {"b", "d"}, 1, {"e", "b", "a"}, 0, {"a", "b", "d", "e"}},
-        {kSub, {"B", "d"}, 16, {"b", "D"}, 0, {"B", "d"}},
-        {kAnd, {}, 0, {"x"}, 0, {}},
-        {kSub, {"x"}, 0, {}, 1, {"x"}},
-        {kOr, {}, 0, {}, 0, {}},
-    };
-    for (const auto &row : rows) {
-        for (const int flags : {0, static_cast<int>(TLIB_SZLIST_NEW)}) {
-            SCOPED_TRACE(testing::PrintToString(row.a) + testing::PrintToString(row.b) + std::to_string(flags));
-            // Holes in either list are ignored.
-            List a = MakeList(row.a, row.a_mode);
-            List b = MakeList(row.b, row.b_mode);
-            if (!row.a_mode)
-                Insert(a, a->nItem + 1, row.a.empty() ? "" : SzTLIBSzListPop(a.get()));
-            if (!row.b_mode)
-                Insert(b, b->nItem + 1, row.b.empty() ? "" : SzTLIBSzListPop(b.get()));
-            if (!row.a_mode && row.a.empty())
-                TLIBSzListRemoveAll(a.get());
-            const Texts a_before = Items(a.get());
-            const Texts b_before = Items(b.get());
-            test::ForgetFault();
-            TLIBSZLIST *a_addr = a.release();
-            TLIBSZLIST *result = row.operation == kAnd  ? PslTLIBSzListAnd(a_addr, b.get(), flags)
-                                 : row.operation == kOr ? PslTLIBSzListOr(&a_addr, b.get(), flags)
-                                                        : PslTLIBSzListSub(a_addr, b.get(), flags);
-            a.reset(a_addr);
-            ASSERT_TRUE(result);
-            const List owned(flags ? result : nullptr);
-            EXPECT_EQ(flags ? result != a.get() : result == a.get(), true);
-            EXPECT_EQ(Items(result), row.result);
-            EXPECT_EQ(result->fMode, row.a_mode);
-            if (flags) {
-                EXPECT_EQ(Items(a.get()), a_before);
-            }
-            EXPECT_EQ(Items(b.get()), b_before);
-            EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS);
-        }
-    }
 }
 
 TEST(ListSets, OfAListWithItself)
