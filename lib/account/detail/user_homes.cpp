@@ -12,6 +12,7 @@
 #include "core/detail/setting_switch.h"
 #include "core/detail/shell_command.h"
 
+#include <algorithm>
 #include <charconv>
 #include <filesystem>
 
@@ -172,6 +173,9 @@ HomePlan PlanHomes(std::span<const DoneUser> done, Marker &marker)
             marker.homes.push_back({HomeStep::kMake, user.name, {}, user.uid, user.gid, 0});
         if (!user.IsRenamed())
             continue;
+        for (HomeStep &step : marker.homes)
+            if (step.kind == HomeStep::kMake && step.name == user.old_name)
+                step.name = user.name;  // could not be made so far
         if (const uint64_t inode = InodeOf(homes, user.old_name))
             marker.homes.push_back({HomeStep::kMove, user.old_name, user.name, -1, -1, inode});
         else
@@ -188,6 +192,9 @@ HomePlan PlanRemovals(std::span<const std::string> names, Marker &marker)
         plan.Unknown("");
     const std::string volume = VolumeOf(path);
     const Fd homes = volume.empty() ? Fd() : OpenDirectory(path.c_str());
+    std::erase_if(marker.homes, [&](const HomeStep &step) {
+        return step.kind == HomeStep::kMake && std::find(names.begin(), names.end(), step.name) != names.end();
+    });
     const size_t before = marker.homes.size();
     for (const std::string &name : names)
         if (const uint64_t inode = InodeOf(homes, name))
