@@ -4,7 +4,8 @@
 
 #include "account/detail/account_commit.h"
 #include "account/detail/account_session.h"
-#include "account/detail/user_homes.h"
+#include "account/detail/home_plan.h"
+#include "account/detail/home_steps.h"
 #include "core/detail/where.h"
 
 #include <vector>

@@ -1,8 +1,6 @@
 // The appliance's volumes: file systems mounted at /volume1, /volume2, ...
 #include "service/detail/volume_list.h"
 
-#include "core/detail/strict_number.h"
-
 #include <algorithm>
 #include <climits>
 
@@ -10,8 +8,6 @@
 
 namespace tavo {
 namespace {
-
-constexpr std::string_view kStem = "/volume";
 
 bool OneOf(std::string_view text, std::initializer_list<std::string_view> words)
 {
@@ -32,20 +28,6 @@ bool IsBehindUsb(std::string_view device)
 }
 
 }  // namespace
-
-int VolumeNumber(std::string_view path) noexcept
-{
-    if (!path.starts_with(kStem) || path.substr(kStem.size()).starts_with('0'))
-        return 0;
-    const std::optional<int> number = StrictNumber<int>(path.substr(kStem.size()));
-    return number && *number > 0 ? *number : 0;
-}
-
-std::string_view VolumeOf(std::string_view path) noexcept
-{
-    const std::string_view volume = path.substr(0, path.find('/', 1));
-    return VolumeNumber(volume) ? volume : std::string_view();
-}
 
 std::vector<Volume> VolumesIn(const std::vector<Mount> &mounts)
 {

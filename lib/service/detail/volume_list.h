@@ -3,6 +3,7 @@
 #define TAVO_SERVICE_DETAIL_VOLUME_LIST_H
 
 #include "core/detail/mount_table.h"
+#include "core/detail/volume_path.h"
 
 #include <string>
 #include <string_view>
@@ -22,12 +23,6 @@ struct Volume {
 
 // Lists the volumes among the mounts, by number. If a path is mounted over, its last mount counts.
 std::vector<Volume> VolumesIn(const std::vector<Mount> &mounts);
-
-// Returns the number of "/volumeN"; 0 for anything else.
-int VolumeNumber(std::string_view path) noexcept;
-
-// Returns the "/volumeN" that holds the path; empty when no volume does.
-std::string_view VolumeOf(std::string_view path) noexcept;
 
 std::vector<Volume> MountedVolumes();
 
