@@ -25,10 +25,11 @@ TEST(FailingCalls, ReturnTheirCodes)
         int error, code;
     };
     constexpr Row rows[] = {
-        {Call::fstat, EIO, ERR_STAT_FAILED},      {Call::write, EIO, ERR_WRITE_FAILED},
-        {Call::write, ENOSPC, ERR_WRITE_FAILED},  {Call::fsync_file, EIO, ERR_WRITE_FAILED},
-        {Call::fchmod, EPERM, ERR_WRITE_FAILED},  {Call::fchown, EPERM, ERR_WRITE_FAILED},
-        {Call::rename, EBUSY, ERR_RENAME_FAILED}, {Call::read, EIO, ERR_WRITE_FAILED},
+        {Call::fstat, EIO, ERR_STAT_FAILED},       {Call::fstat_written, EIO, ERR_WRITE_FAILED},
+        {Call::write, EIO, ERR_WRITE_FAILED},      {Call::write, ENOSPC, ERR_WRITE_FAILED},
+        {Call::fsync_file, EIO, ERR_WRITE_FAILED}, {Call::fchmod, EPERM, ERR_WRITE_FAILED},
+        {Call::fchown, EPERM, ERR_WRITE_FAILED},   {Call::rename, EBUSY, ERR_RENAME_FAILED},
+        {Call::read, EIO, ERR_WRITE_FAILED},
     };
     const int descriptors = test::OpenDescriptors();
     for (const std::string &parent : test::Parents()) {
@@ -59,18 +60,14 @@ TEST(FailingCalls, OfReadersAreReported)
     const std::string file = dir / "file";
     const char *const path = file.c_str();
     test::WriteFile(file, kOldText);
-    test::Owned<TLIBSZHASH> hash = test::HashOf({});
-    test::Owned<TLIBSZLIST> list = test::ListOf({});
-    const auto fails = [](const char *module, int result) {
-        EXPECT_EQ(result, -1) << module;
-        EXPECT_EQ(LastFault(), (Fault{ERR_READ_FAILED, module}));
-    };
+    test::Room room;
     test::FailCalls(Call::read, EIO);
-    fails("file_get_keys", TLIBFileGetKeys(path, nullptr, hash, "="));
-    fails("file_get_section", TLIBFileGetSection(path, "net", hash));
-    fails("file_enum_section", TLIBFileEnumSection(path, list));
-    fails("file_read_lines", TLIBFileReadLines(path, list));
-    fails("file_append_key", TLIBFileAppendKey(path, "added", "v", nullptr));
+    for (const test::Reader &reader : test::kReaders) {
+        EXPECT_EQ(reader.read(path, room.hash, room.list), -1) << reader.module;
+        EXPECT_EQ(LastFault(), (Fault{ERR_READ_FAILED, reader.module}));
+    }
+    EXPECT_EQ(TLIBFileAppendKey(path, "added", "v", nullptr), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_READ_FAILED, "file_append_key"}));
     test::FailCalls(Call::none, 0);
     EXPECT_EQ(test::ReadFile(file), kOldText);
 }
@@ -141,29 +138,56 @@ TEST(Comment, ComesFromTheScratchFileThatItCouldLock)
     const test::Place dir("/etc");
     const std::string file = dir / "file";
     const std::string commented = std::string(kOldText).insert(kOldText.find("key"), ";");
-    for (const int error : {0, EIO, ENOLCK, ENOSYS}) {
+    // The file of a process that died is removed first.
+    constexpr int kStale = -1;
+    for (const int error : {0, kStale, EIO, ENOLCK, ENOSYS}) {
         test::WriteFile(file, kOldText);
-        test::FailCalls(error ? Call::flock : Call::none, error);
+        if (error == kStale)
+            test::WriteFile(test::kScratch, "half written");
+        test::FailCalls(error > 0 ? Call::flock : Call::none, error);
         EXPECT_EQ(TLIBFileComment(file.c_str(), "key"), 1) << error;
         test::FailCalls(Call::none, 0);
-        EXPECT_EQ(std::string(test::RenamedFrom()) == test::kScratch, error == 0) << test::RenamedFrom();
+        EXPECT_EQ(std::string(test::RenamedFrom()) == test::kScratch, error <= 0) << test::RenamedFrom();
         EXPECT_EQ(test::ReadFile(file), commented) << error;
         EXPECT_THAT(dir.Names(), ElementsAre("file")) << error;
     }
-    test::EachAllocation faults;
-    while (faults.Next()) {
-        test::WriteFile(file, kOldText);
-        test::ForgetFault();
-        faults.Arm();
-        const int result = TLIBFileComment(file.c_str(), "key");
-        faults.Disarm();
-        EXPECT_EQ(result, faults.Fired() ? -1 : 1);
-        EXPECT_EQ(TLIBErrGet(), faults.Fired() ? ERR_OUT_OF_MEMORY : ERR_SUCCESS);
-        EXPECT_EQ(test::ReadFile(file), faults.Fired() ? kOldText : commented);
-        EXPECT_EQ(faults.LeftAllocated(), 0);
-        EXPECT_THAT(dir.Names(), ElementsAre("file"));
+}
+
+TEST(OutOfMemory, FailsEveryWriterAndReader)
+{
+    const auto no_memory = testing::AnyOf(ERR_OUT_OF_MEMORY, ERR_OPEN_FAILED, ERR_WRITE_FAILED);
+    test::NewPairs();
+    for (const std::string &parent : test::Parents()) {
+        const test::Place dir(parent);
+        const std::string file = dir / "file";
+        const auto each = [&](const char *name, const auto &call) {
+            SCOPED_TRACE(name);
+            test::EachAllocation faults;
+            while (faults.Next()) {
+                test::WriteFile(file, kOldText);
+                test::Room room;
+                test::ForgetFault();
+                faults.Arm();
+                const int result = call(file.c_str(), room);
+                faults.Disarm();
+                // A stream of the C library works without a buffer, too.
+                EXPECT_TRUE(faults.Fired() ? result <= 0 || std::string_view(name).ends_with("Section") : result > 0);
+                if (result <= 0) {
+                    EXPECT_THAT(TLIBErrGet(), no_memory);
+                    EXPECT_EQ(test::ReadFile(file), kOldText);
+                }
+                EXPECT_LE(faults.LeftAllocated(), 0);
+                EXPECT_THAT(dir.Names(), ElementsAre("file"));
+            }
+            EXPECT_GT(faults.Count(), 0);
+        };
+        for (const test::Writer &writer : test::kRewriters)
+            each(writer.name, [&](const char *path, auto &) { return writer.write(path); });
+        for (const test::Writer &writer : test::kAppenders)
+            each(writer.name, [&](const char *path, auto &) { return writer.write(path); });
+        for (const test::Reader &reader : test::kReaders)
+            each(reader.module, [&](const char *path, auto &room) { return reader.read(path, room.hash, room.list); });
     }
-    EXPECT_GT(faults.Count(), 2);
 }
 
 // Memory runs out: a published line, and published log lines, which every_call/ does not look at.

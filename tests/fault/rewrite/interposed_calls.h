@@ -13,7 +13,8 @@ void DieAtCall(int n);
 // Before the n-th of these calls from now on the process stops (SIGSTOP).
 void StopAtCall(int n);
 
-enum class Call { none, fstat, read, write, fsync_file, fsync_directory, fchmod, fchown, rename, flock };
+// Of the calls of fstat all, or those of files that are open for writing and hold something.
+enum class Call { none, fstat, fstat_written, read, write, fsync_file, fsync_directory, fchmod, fchown, rename, flock };
 
 // From now on these calls fail with this errno.
 void FailCalls(Call call, int error);

@@ -55,6 +55,41 @@ inline constexpr Writer kAppenders[] = {
 
 #undef WRITER
 
+// Every function that reads a settings file into a container.
+struct Reader {
+    const char *module;
+    int (*read)(const char *path, TLIBSZHASH **hash, TLIBSZLIST **list);
+};
+
+inline constexpr Reader kReaders[] = {
+    {"file_get_keys",
+     [](auto *path, auto **hash, auto **) {
+         return TLIBFileGetKeys(path, nullptr, hash, "=");
+     }},
+    {"file_get_keys",
+     [](auto *path, auto **hash, auto **list) {
+         return TLIBFileGetKeys(path, *list, hash, "=");
+     }},
+    {"file_get_section",
+     [](auto *path, auto **hash, auto **) {
+         return TLIBFileGetSection(path, "net", hash);
+     }},
+    {"file_enum_section",
+     [](auto *path, auto **, auto **list) {
+         return TLIBFileEnumSection(path, list);
+     }},
+    {"file_read_lines",
+     [](auto *path, auto **, auto **list) {
+         return TLIBFileReadLines(path, list);
+     }},
+};
+
+// Containers that have to grow; "key" is wanted.
+struct Room {
+    Owned<TLIBSZHASH> hash{MakeHash({}, 8)};
+    Owned<TLIBSZLIST> list{MakeList({"key", std::string(470, 'x')})};
+};
+
 // On the file system of /etc/skel, TLIBFileComment begins its new file there, under this name.
 inline constexpr const char *kScratch = "/etc/skel/tempErrTLIBFileComment";
 
