@@ -15,6 +15,7 @@ class AccountStory : public testing::Test {
     AccountStory()
     {
         story_.Mask("^(        home [a-z]+ .*) [0-9]+$", "$1 INODE");
+        story_.Mask("[0-9]+:[0-9]+:[0-9]+\\.[0-9]{9}", "IDENTITY");  // of a file
         story_.Mask("@del_users_home_[0-9]+", "@del_users_home_PID");
     }
 

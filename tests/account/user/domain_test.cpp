@@ -4,6 +4,7 @@
 #include "tavo_group.h"
 #include "tavo_user.h"
 
+#include "account/account_story.h"
 #include "account/user/user_fixture.h"
 #include "support/domain_entries.h"
 #include "support/test.h"
@@ -64,21 +65,17 @@ TEST(DomainAccounts, GoWithARebuildWhenStale)
     EXPECT_EQ(TLIBErrGet(), ERR_NO_SUCH_USER);
 }
 
-TEST(DroppedLines, AreNamedInTheLog)
+using DroppedLines = test::AccountStory;
+
+TEST_F(DroppedLines, AreNamedInTheLog)
 {
-    const test::CapturedLog log;
     test::WriteFile("/etc/passwd", test::FileText("/etc/passwd") +
                                        "# comment\n+::::::\neight:x:905:100:::/bin/sh:more\nroot:secret:0:0:::\n");
-    ASSERT_EQ(test::AddUser({.name = "alice", .password = "x"}), 0);
-    std::string lines;
-    for (const std::string &text : log.Texts())
-        if (text.find("is not written again") != text.npos)
-            lines += text + "\n";
-    for (const char *name : {"[+]", "[eight]", "[root]"})
-        EXPECT_NE(lines.find(name), std::string::npos) << name << " in " << lines;
-    EXPECT_EQ(lines.find("comment"), std::string::npos);
-    EXPECT_EQ(lines.find("secret"), std::string::npos);
-    EXPECT_EQ(test::FileText("/etc/passwd").find("eight"), std::string::npos);
+    test::WriteFile("/etc/group", "root:x:0:\n# comment\nfive:x:7:a:b\n:x:8:\nDOM\\a:x:9:\nroot:x:10:\nlp:x:7:\n");
+    test::WriteFile("/etc/group_desc", "no colon\n:no name\nghost:x\nlp:print\nlp:again\nROOT:in capitals\n");
+    TELL(test::AddUser({.name = "alice", .password = "x"}));
+    TELL(test::AddGroup("one", 9000));
+    TELL(test::AddGroup("two", 9000));
 }
 
 }  // namespace

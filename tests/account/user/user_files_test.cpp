@@ -1,6 +1,7 @@
 // The contents of the four account files after every change, to the byte.
 #include "tavo_user.h"
 
+#include "account/account_story.h"
 #include "account/user/user_fixture.h"
 #include "support/test.h"
 
@@ -25,105 +26,64 @@ extern "C" time_t time(time_t *out)
 namespace {
 
 using test::GetUser;
-using test::MakeUser;
-using test::SetUser;
+using UserFiles = test::AccountStory;
 
-// The four files must be those of the folder golden/STATE. With TAVO_KEEP_GOLDEN in the environment they are written.
-void ExpectFiles(const std::string &state)
+TEST_F(UserFiles, EveryChangeInTurn)
 {
-    for (const char *path : test::kAccountFiles) {
-        const std::string golden =
-            std::string(TEST_GOLDEN) + "/" + state + "/" + std::string(std::filesystem::path(path).filename());
-        if (const char *kept = std::getenv("TAVO_KEEP_GOLDEN")) {
-            const std::filesystem::path copy =
-                std::filesystem::path(kept) / state / std::filesystem::path(path).filename();
-            std::filesystem::create_directories(copy.parent_path());
-            test::WriteFile(copy, test::FileText(path));
-        }
-        EXPECT_EQ(test::FileText(path), test::ReadFile(golden)) << state << ": " << path;
-    }
-}
-
-TEST(UserFiles, EveryChangeInTurn)
-{
-    test::CapturedLog log;
-    const auto modified = [](const char *name, const std::function<void(TAVOUSER &)> &change) {
+    constexpr int kDayAndMore = 86411;
+    const auto modify = [&](const char *name, const std::function<void(TAVOUSER &)> &change) {
         const test::User user = GetUser(name);
         ASSERT_TRUE(user) << name;
         TAVOUSER changed = *user;
         change(changed);
-        EXPECT_EQ(SetUser(name, &changed), 0) << name;
+        story_.Tell(std::string("change ") + name, [&] { return test::SetUser(name, &changed); });
     };
-
-    EXPECT_EQ(test::AddUser({.name = "alice",
-                             .password = "wonderland",
-                             .description = "Alice: the first",
-                             .mail = "alice@example.org",
-                             .privilege = 5}),
-              0);
-    now += 86411;
-    EXPECT_EQ(test::AddUser({.name = "Bob",
-                             .password = "",
-                             .uid = 2000,
-                             .gid = 7,
-                             .home = "/volume1/bob",
-                             .shell = "/bin/sh",
-                             .expire = 20000}),
-              0);
-    EXPECT_EQ(test::AddUser({.name = "J\xC3\xBCrgen M",
-                             .password = "Stra\xC3\x9F"
-                                         "e",
-                             .cannot_change = true}),
-              0);
-    ExpectFiles("1-added");
-
-    now += 86411;
-    modified("alice", [](TAVOUSER &user) {
+    const test::UserTexts added[] = {
+        {.name = "alice",
+         .password = "wonderland",
+         .description = "Alice: the first",
+         .mail = "alice@example.org",
+         .privilege = 5},
+        {.name = "Bob", .uid = 2000, .gid = 7, .home = "/volume1/bob", .shell = "/bin/sh", .expire = 20000},
+        {.name = "J\xC3\xBCrgen M", .password = "Stra\xC3\x9F", .cannot_change = true}};
+    for (const test::UserTexts &texts : added) {
+        TELL(test::AddUser(texts));
+        now += kDayAndMore;
+    }
+    modify("alice", [](TAVOUSER &user) {
         user.szDesc = const_cast<char *>("100% Alice");
         user.nExpired = 30000;
         user.fCannotChgPasswd = 1;
         user.nPrivilege = 35;
     });
-    modified("bob", [](TAVOUSER &user) { user.szMail = const_cast<char *>("bob@example.org"); });
-    ExpectFiles("2-modified");
-
-    now += 86411;
-    EXPECT_EQ(test::Rename("alice", "carol"), 0);
-    EXPECT_EQ(test::Rename("BOB", "bOB"), 0);
-    ExpectFiles("3-renamed");
-
-    now += 86411;
-    modified("carol", [](TAVOUSER &user) { user.szPasswd = const_cast<char *>("looking glass"); });
-    modified("admin", [](TAVOUSER &user) { user.szPasswd = const_cast<char *>("first"); });
-    const test::User bob = MakeUser({.name = "bob"});
+    modify("bob", [](TAVOUSER &user) { user.szMail = const_cast<char *>("bob@example.org"); });
+    now += kDayAndMore;
+    TELL(test::Rename("alice", "carol"));
+    TELL(test::Rename("BOB", "bOB"));
+    now += kDayAndMore;
+    modify("carol", [](TAVOUSER &user) { user.szPasswd = const_cast<char *>("looking glass"); });
+    modify("admin", [](TAVOUSER &user) { user.szPasswd = const_cast<char *>("first"); });
+    const test::User bob = test::MakeUser({.name = "bob"});
     const TAVOUSER *records[] = {bob.get()};
     const char *hashes[] = {"$1$abcdefgh$0123456789abcdefghijkl"};
     const char *lm[] = {"00112233445566778899AABBCCDDEEFF"};
     const char *nt[] = {"FFEEDDCCBBAA99887766554433221100"};
-    EXPECT_EQ(TAVOUserSetPasswd(records, hashes, lm, nt, 1), 0);
-    ExpectFiles("4-passwords");
-
-    now += 86411;
-    EXPECT_EQ(test::DeleteUser("CAROL"), 0);
-    EXPECT_EQ(test::DeleteUser("j\xC3\x9CRGEN m"), 0);
-    ExpectFiles("5-deleted");
-
-    now += 86411;
-    EXPECT_EQ(TAVOUserAgingSet("bob", 1, 90, 14), 0);
-    EXPECT_EQ(TAVOUserLockSet("BOB", 1), 0);
-    EXPECT_EQ(TAVOUserLockSet("admin", 1), 0);
-    EXPECT_EQ(TAVOUserAgingSet("admin", -1, 365, -1), 0);
-    ExpectFiles("6-locked");
-
-    // A change of something else does not unlock.
-    now += 86411;
-    modified("bob", [](TAVOUSER &user) { user.szDesc = const_cast<char *>("away"); });
-    EXPECT_EQ(TAVOUserLockSet("admin", 0), 0);
-    ExpectFiles("7-unlocked");
+    TELL(TAVOUserSetPasswd(records, hashes, lm, nt, 1));
+    now += kDayAndMore;
+    TELL(test::DeleteUser("CAROL"));
+    TELL(test::DeleteUser("j\xC3\x9CRGEN m"));
+    now += kDayAndMore;
+    TELL(TAVOUserAgingSet("bob", 1, 90, 14));
+    TELL(TAVOUserLockSet("BOB", 1));
+    TELL(TAVOUserLockSet("admin", 1));
+    TELL(TAVOUserAgingSet("admin", -1, 365, -1));
+    now += kDayAndMore;
+    modify("bob", [](TAVOUSER &user) { user.szDesc = const_cast<char *>("away"); });  // which does not unlock
+    TELL(TAVOUserLockSet("admin", 0));
 }
 
 // The system's own readers take every line, and a login with the password succeeds.
-TEST(UserFiles, TheSystemReadsThem)
+TEST_F(UserFiles, TheSystemReadsThem)
 {
     ASSERT_EQ(test::AddUser({.name = "alice", .password = "wonder:land", .description = "a:b"}), 0);
     ASSERT_EQ(test::AddUser({.name = "J\xC3\xBCrgen M", .password = "", .expire = 20000, .cannot_change = true}), 0);

@@ -3,6 +3,7 @@
 #include "tavo_group.h"
 #include "tavo_user.h"
 
+#include "account/account_story.h"
 #include "account/group/group_fixture.h"
 #include "account/user/user_fixture.h"
 #include "support/rounds.h"
@@ -79,6 +80,11 @@ int rename(const char *from, const char *to)
     if (const auto act = std::exchange(meanwhile, nullptr))
         act();
     return Fails("rename") ? -1 : Next<int(const char *, const char *)>("rename")(from, to);
+}
+
+char *mkdtemp(char *name)
+{
+    return Fails("mkdtemp") ? nullptr : Next<char *(char *)>("mkdtemp")(name);
 }
 
 int fchown(int fd, uid_t uid, gid_t gid)
@@ -375,8 +381,10 @@ TEST(UserStore, SambaChangesItsFileMeanwhile)
     EXPECT_NE(test::LineOf(path, "alice").find(hash_of(rounds - 1)), std::string::npos);
 }
 
+using Stores = test::AccountStory;
+
 // Accounts that share a user id, differ in case only, or have ids beyond the index survive every rewrite.
-TEST(UserStore, OddAccountsSurvive)
+TEST_F(Stores, OddAccountsSurvive)
 {
     for (const char *line :
          {"toor:x:0:0::/root:/bin/sh", "Root:x:0:0::/root:/bin/sh", "big:x:4294967294:1::/:/bin/false",
@@ -385,122 +393,110 @@ TEST(UserStore, OddAccountsSurvive)
     ExternalEdit("/etc/shadow", "Root:mine:1:0:99999:7:::");
     ASSERT_EQ(AddUser({.name = "alice"}), 0);
     ForgetStores();
-    ASSERT_EQ(AddUser({.name = "bob", .uid = 1800}), 0);
-    std::vector<std::string> ids;
-    for (const std::string &line : test::Lines(test::FileText("/etc/passwd"))) {
-        const size_t begin = line.find(":x:") + 3;
-        ids.push_back(line.substr(0, line.find(':')) + " " + line.substr(begin, line.find(':', begin) - begin));
-    }
-    EXPECT_EQ(ids, (std::vector<std::string>{"root 0", "Root 0", "toor 0", "lp 7", "ftp 21", "anonymous 21", "smmsp 25",
-                                             "postgres 55", "nobody 1023", "admin 1024", "guest 1025", "alice 1027",
-                                             "pc$ 1800", "bob 1800", "large 2000000", "big 4294967294"}));
-    EXPECT_EQ(test::LineOf("/etc/shadow", "Root"), "Root:mine:1:0:99999:7:::");
-    EXPECT_EQ(test::LineOf("/etc/shadow", "root"), "root:*:14600:0:99999:7:::");
+    TELL(AddUser({.name = "bob", .uid = 1800}));
     TAVOUSER *user = nullptr;
-    ASSERT_EQ(TAVOUserGetByUID(2000000, &user), 0);
-    EXPECT_STREQ(user->szName, "large");
-    TAVOUserFree(user);
-    ASSERT_EQ(test::DeleteUser("pc$"), 0);
-    user = nullptr;
-    ASSERT_EQ(TAVOUserGetByUID(1800, &user), 0) << "the one that is left";
-    EXPECT_STREQ(user->szName, "bob");
+    const auto show = [&](int uid) {
+        TELL(TAVOUserGetByUID(uid, &user));
+        story_.Show("name", user->szName);
+    };
+    show(2000000);
+    TELL(test::DeleteUser("pc$"));
+    show(1800);  // the one that is left
     TAVOUserFree(user);
 }
 
 // Nothing is there at all: a start from nothing. Later files appear beside.
-TEST(UserStore, EmptyStart)
+TEST_F(Stores, EmptyStart)
 {
+    const auto show_modes = [&] {
+        struct stat st = {};
+        for (const char *path : test::kAccountFiles)
+            story_.Show(path, ::stat(path, &st) == 0 ? int(st.st_mode & 07777) : -1);
+        return st.st_gid;
+    };
     for (const char *path : test::kAccountFiles)
         ::unlink(path);
-    EXPECT_FALSE(GetUser("admin"));
+    TELL(GetUser("admin") != nullptr);
     ASSERT_EQ(std::filesystem::remove_all("/usr/tavo/etc/private"), 1u);
-    ASSERT_EQ(AddUser({.name = "first"}), 0);
-    EXPECT_EQ(test::FileText("/etc/passwd"), "first:x:1024:100::/var/services/homes/first:/bin/csh\n");
-    struct stat st;
-    constexpr unsigned modes[] = {0644, 0600, 0644, 0600};
-    for (size_t i = 0; i < std::size(modes); ++i) {
-        ASSERT_EQ(::stat(test::kAccountFiles[i], &st), 0);
-        EXPECT_EQ(st.st_mode & 07777, modes[i]) << test::kAccountFiles[i];
-    }
+    TELL(AddUser({.name = "first"}));
+    show_modes();
     ASSERT_EQ(::chmod("/etc/shadow", 0640), 0);
     if (::chown("/etc/shadow", 0, 42) != 0)
         GTEST_SKIP() << "only one user id is mapped here";
-    ASSERT_EQ(AddUser({.name = "second"}), 0);
+    TELL(AddUser({.name = "second"}));
+    show_modes();
+    struct stat st;
     ASSERT_EQ(::stat("/etc/shadow", &st), 0);
-    EXPECT_EQ(st.st_mode & 07777, 0640u);
     EXPECT_EQ(st.st_gid, 42u);
 }
 
 // A program with handles of its own: what it deletes it may write, but stores that lack an account are not written.
-TEST(UserStore, DumpNeverLosesAnAccount)
+TEST_F(Stores, DumpNeverLosesAnAccount)
 {
-    ASSERT_EQ(AddUser({.name = "alice"}), 0);
-    ASSERT_EQ(AddUser({.name = "bob"}), 0);
-    const auto before = AllFiles();
-    const auto open = [] {
+    for (const char *name : {"alice", "bob"})
+        ASSERT_EQ(AddUser({.name = name}), 0);
+    const auto with_stores = [&](const std::function<void(TAVOUSERDB &)> &work) {
         TAVOBDB *stores[5];
         for (size_t i = 0; i < 5; ++i)
             stores[i] = TAVOBDbOpen(kStores[i], O_RDWR, 1);
-        return TAVOUSERDB{stores[0], stores[1], stores[2], stores[3], stores[4]};
-    };
-    const auto close = [](const TAVOUSERDB &db) {
-        for (TAVOBDB *store : {db.pName, db.pMisc, db.pShadow, db.pSmb, db.pUid})
+        TAVOUSERDB db{stores[0], stores[1], stores[2], stores[3], stores[4]};
+        work(db);
+        for (TAVOBDB *store : stores)
             EXPECT_EQ(TAVOBDbClose(store), 0);
     };
-    TAVOUSERDB db = open();
-    EXPECT_EQ(TAVOBDbDelete(db.pName, "ALICE", 6), 0);
-    close(db);
-    db = open();
-    EXPECT_EQ(test::FaultOf(TAVOUserDBDump(&db)), (test::Fault{ERR_WRITE_FAILED, "user_db_dump"}));
-    EXPECT_EQ(AllFiles(), before);
-    EXPECT_EQ(TAVOBDbDelete(db.pName, "BOB", 4), 0);
-    EXPECT_EQ(TAVOBDbSet(db.pName, "ALICE", 6, "alice:x:1027:100::/:/bin/csh", 29), 0);
-    EXPECT_EQ(TAVOUserDBDump(&db), 0);
-    EXPECT_EQ(test::LineOf("/etc/passwd", "bob"), "");
-    EXPECT_EQ(test::LineOf("/etc/passwd", "alice"), "alice:x:1027:100::/:/bin/csh");
+    with_stores([&](TAVOUSERDB &db) { TELL(TAVOBDbDelete(db.pName, "ALICE", 6)); });
     const test::User carol = test::MakeUser({.name = "carol", .uid = 1200, .gid = 100});
-    EXPECT_EQ(TAVOUserDBSet(&db, "ALICE", carol.get()), 0);
-    EXPECT_EQ(test::FaultOf(TAVOUserDBSet(&db, nullptr, carol.get())), (test::Fault{ERR_USER_EXISTS, "user_db_set"}));
-    EXPECT_EQ(TAVOUserDBDump(&db), 0);
-    EXPECT_EQ(TAVOUserDBGetFreeUid(&db), 1029);
-    close(db);
-    EXPECT_TRUE(GetUser("carol"));
-    EXPECT_FALSE(GetUser("alice"));
-    EXPECT_EQ(TAVOUserDBDump(nullptr), -1);
-    EXPECT_EQ(TAVOUserDBGetFreeUid(nullptr), -1);
+    const test::User domain = test::MakeUser({.name = "DOM\\dora"});
+    with_stores([&](TAVOUSERDB &db) {
+        TELL(TAVOUserDBDump(&db));
+        TELL(TAVOBDbDelete(db.pName, "BOB", 4));
+        TELL(TAVOBDbSet(db.pName, "ALICE", 6, "alice:x:1027:100::/:/bin/csh", 29));
+        TELL(TAVOUserDBDump(&db));
+        TELL(TAVOUserDBSet(&db, "ALICE", carol.get()));
+        TELL(TAVOUserDBSet(&db, nullptr, carol.get()));
+        TELL(TAVOUserDBSet(&db, nullptr, domain.get()));
+        TELL(TAVOUserDBDump(&db));
+        TELL(TAVOUserDBGetFreeUid(&db));
+    });
+    for (const char *name : {"carol", "alice"})
+        TELL(GetUser(name) != nullptr);
 }
 
-// Each write, sync, rename and change of owner fails once: the code, the old files, and the next change works.
-TEST(UserStore, DisksThatFail)
+// Each write, sync, change of owner and folder fails once: the code, the old files, and the next change works.
+TEST_F(Stores, OnDisksThatFail)
 {
     ASSERT_EQ(AddUser({.name = "alice", .password = "x"}), 0);
     const struct {
         const char *function;
         int reason;
-        int code;
-    } rows[] = {
-        {"write", ENOSPC, ERR_NOT_ENOUGH_SPACE}, {"write", EIO, ERR_WRITE_FAILED},    {"fsync", EIO, ERR_WRITE_FAILED},
-        {"fsync", EDQUOT, ERR_NOT_ENOUGH_SPACE}, {"fchown", EPERM, ERR_WRITE_FAILED},
-    };
+    } rows[] = {{"write", ENOSPC}, {"write", EIO},      {"fsync", EIO},    {"fsync", EDQUOT},
+                {"fchown", EPERM}, {"mkdtemp", ENOSPC}, {"mkdtemp", EROFS}};
     for (const auto &row : rows) {
-        const auto before = AllFiles();
-        int failed = 0;
-        for (int call = 1;; ++call) {
+        for (int call = 1, hit = true; hit; ++call) {
+            if (std::strcmp(row.function, "mkdtemp") == 0)
+                ForgetStores();
             fault = {row.function, call, row.reason};
-            const int code = AddUser({.name = "bob", .password = "y"});
-            const bool hit = fault.countdown <= 0;
+            story_.Head(row.function + std::string(" ") + std::to_string(call) + ": " + ::strerrorname_np(row.reason));
+            TELL(AddUser({.name = "bob", .password = "y"}));
+            hit = fault.countdown <= 0;
             fault = {};
-            if (!hit || code == 0)
-                break;  // beyond the last one, or one that does not matter any more
-            ++failed;
-            EXPECT_EQ(test::LastFault(), (test::Fault{row.code, "user_db_dump"})) << row.function << " " << call;
-            EXPECT_EQ(AllFiles(), before) << row.function << " " << call;
             for (const char *path : test::kAccountFiles)
                 EXPECT_NE(::access((std::string(path) + ".tmp").c_str(), F_OK), 0) << path;
-            EXPECT_FALSE(GetUser("bob")) << row.function << " " << call;
+            test::DeleteUser("bob");
         }
-        EXPECT_GE(failed, std::strcmp(row.function, "fchown") == 0 ? 4 : 5) << row.function;
-        ASSERT_EQ(test::DeleteUser("bob"), 0);
+    }
+}
+
+// The first of the four renames fails: nothing has happened. A later one fails: the next call finishes what was begun.
+TEST_F(Stores, RenamesThatFail)
+{
+    ASSERT_TRUE(GetUser("admin"));  // the stores are there: the renames that follow are those of the files
+    for (int call = 1; call <= 4; ++call) {
+        const std::string name = "user" + std::to_string(call);
+        fault = {"rename", call, EIO};
+        TELL(AddUser({.name = name, .password = "x"}));
+        fault = {};
+        TELL(GetUser(name) != nullptr);
     }
 }
 
@@ -583,23 +579,6 @@ TEST(UserStore, SyncsOfABatch)
     EXPECT_EQ(test::FileText("/usr/tavo/etc/netbkp.users") + test::FileText("/etc/rsyncd.secrets"),
               "admin\nroot:secret\n");
     EXPECT_EQ(test::LineOf("/etc/ftpchroot", "user7"), "") << "renamed there";
-}
-
-// The first of the four renames fails: nothing has happened. A later one fails: the next call finishes what was begun.
-TEST(UserStore, RenamesThatFail)
-{
-    ASSERT_TRUE(GetUser("admin"));  // the stores are there: the renames that follow are those of the files
-    for (int call = 1; call <= 4; ++call) {
-        const auto before = AllFiles();
-        const std::string name = "user" + std::to_string(call);
-        fault = {"rename", call, EIO};
-        EXPECT_EQ(AddUser({.name = name, .password = "x"}), ERR_RENAME_FAILED) << call;
-        fault = {};
-        EXPECT_TRUE(call > 1 || AllFiles() == before);
-        EXPECT_EQ(GetUser(name) != nullptr, call > 1) << call;
-        for (const char *path : test::kAccountFiles)
-            EXPECT_EQ(!test::LineOf(path, name).empty(), call > 1) << path << " " << call;
-    }
 }
 
 }  // namespace
