@@ -84,10 +84,12 @@ TEST(TavoctlContract, WithoutRightsAVerbSaysSo)
     ASSERT_EQ(std::system("rm -rf /tmp/lock; tavoctl lock run tavoinfo true"), 0);
     test::WriteFile("/dev/sdq", "");
     ASSERT_EQ(::chmod("/dev/sdq", 0600), 0);
+    test::WriteFile("/tmp/root.pid", std::to_string(::getpid()) + "\n");
     for (const auto &[words, reason] : {std::pair(Words{"lock", "run", "tavoinfo", "true"}, "to open /tmp/lock, "),
                                         {Words{"service", "status", "samba"}, "to open /tmp/lock, "},
                                         {Words{"disk", "temperature", "--wake", "sdq"}, "Permission denied; "},
                                         {Words{"disk", "health", "sdq"}, "Permission denied; "},
+                                        {Words{"proc", "signal", "/tmp/root.pid", "0"}, "Operation not permitted; "},
                                         {Words{"state", "diff", "/etc/shadow"}, "Permission denied; "}}) {
         const test::Ran ran = test::AsNobody([&words = words] { return Tavoctl(words); });
         EXPECT_EQ(ran.status, 5) << ran;

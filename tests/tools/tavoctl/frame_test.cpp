@@ -68,6 +68,7 @@ TEST(TavoctlFrame, WrongCommandLinesAreUsageAndSayNothingOnStandardOutput)
         {"quota", "on", "0"},
         {"quota", "set", "admin", "1", "--", "-1M"},
         {"quota", "set", "admin", "1", "nan"},
+        {"quota", "set", "admin", "1", "1KB"},
     };
     for (const Words &words : lines) {
         const test::Ran ran = Tavoctl(words);
@@ -201,12 +202,11 @@ TEST(TavoctlFrame, QuestionsAreAskedAtATerminalOnly)
         EXPECT_THAT(ran.out, HasSubstr("Remove section [b] of " + dir / "f" + "? [y/N] "));
         EXPECT_EQ(ReadFile(dir / "f"), text) << answer;
     }
-    EXPECT_EQ(TavoctlAtTerminal(remove, "y\n").status, 0);
-    EXPECT_EQ(ReadFile(dir / "f"), "[a]\nk=v\n");
-
-    WriteFile(dir / "f", text);
-    EXPECT_EQ(Tavoctl({"section", "remove", "--yes", "--file", dir / "f", "b"}).status, 0);
-    EXPECT_EQ(ReadFile(dir / "f"), "[a]\nk=v\n");
+    for (const char *answer : {"y\n", "Y\n", "yes\n"}) {
+        WriteFile(dir / "f", text);
+        EXPECT_EQ(TavoctlAtTerminal(remove, answer).status, 0) << answer;
+        EXPECT_EQ(ReadFile(dir / "f"), "[a]\nk=v\n") << answer;
+    }
 }
 
 TEST(TavoctlFrame, AnAnswerThatCannotBeWrittenIsAFailure)
@@ -272,8 +272,8 @@ TEST(TavoctlFrame, ColoursAndThePagerAreForTerminals)
         unsigned short rows;
         bool coloured, paged;
     } cases[] = {
-        {"TERM", "xterm", 0, true, false}, {"TERM", "xterm", 20, true, false},
-        {"TERM", "xterm", 3, true, true},  {"TERM", "dumb", 3, false, true},
+        {"TERM", "xterm", 0, true, false}, {"TERM", "xterm", 5, true, false},
+        {"TERM", "xterm", 4, true, true},  {"TERM", "dumb", 3, false, true},
         {"NO_COLOR", "1", 3, false, true}, {"PAGER", "", 3, true, false},
         {"PAGER", "cat", 3, true, false},  {"PAGER", "/no/such/program 2>/dev/null", 3, true, false},
     };

@@ -178,6 +178,7 @@ TEST(TavoctlPrograms, ProcFindsAndSignals)
     EXPECT_EQ(Tavoctl({"proc", "find", "no-such-process-anywhere"}).status, 3);
 
     EXPECT_EQ(Tavoctl({"proc", "signal", dir / "pid", "0"}).status, 0);
+    EXPECT_EQ(Tavoctl({"proc", "signal", "--dry-run", dir / "pid"}).status, 0);
     EXPECT_EQ(Tavoctl({"proc", "signal", dir / "pid", "SIGUSR1"}).status, 0);
     int status = 0;
     ASSERT_EQ(::waitpid(pid, &status, 0), pid);

@@ -182,6 +182,9 @@ TEST_F(TavoctlService, ReloadSignalsOrSaysWhyNot)
             << daemon;
     }
     EXPECT_EQ(Tavoctl({"service", "reload", "crond"}).status, 3) << "it does not run";
+    EXPECT_EQ(Tavoctl({"service", "reload", "--dry-run", "crond"}).status, 0);
+    EXPECT_EQ(test::Facts({"service", "disable", "--dry-run", "--json", "web"}).at("changes").size(), 3u)
+        << "enabled, running and bound";
     test::IsRefused({"service", "reload", "photo"}, "it has no daemon that could reload", 1);
     Tavoctl({"service", "disable", "samba"});
 }
@@ -210,6 +213,8 @@ TEST_F(TavoctlService, VolumeBindsTheFoldersAndRestoreFindsThemAgain)
     // The volume is unmounted and comes back; meanwhile the link was removed.
     ASSERT_EQ(Tavoctl({"service", "stop", "web"}).status, 0);
     ASSERT_EQ(::unlink("/var/services/web"), 0);
+    EXPECT_EQ(Tavoctl({"service", "restore", "--dry-run", "/volume1"}).status, 0);
+    EXPECT_EQ(LinkTarget("/var/services/web"), "");
     EXPECT_EQ(Tavoctl({"service", "restore", "/volume1"}).status, 0);
     EXPECT_EQ(LinkTarget("/var/services/web"), "/volume1/web");
     EXPECT_EQ(Tavoctl({"service", "status", "web"}).status, 0);

@@ -107,6 +107,8 @@ TEST(TavoctlStorage, VolumesAreListedAndChanged)
     EXPECT_EQ(rows[2].at("group"), nullptr);
 
     scenario.Expect(vgs).Prints(group);
+    EXPECT_EQ(Tavoctl({"lvm", "rename", "--dry-run", "vg1", "vg2"}).status, 0);
+    scenario.Expect(vgs).Prints(group);
     scenario.Expect({"/sbin/lvm", "vgrename", "/dev/vg1", "vg2"});
     EXPECT_EQ(Tavoctl({"lvm", "rename", "vg1", "vg2"}).status, 0);
 

@@ -367,11 +367,14 @@ TEST_F(NetApply, HostileDocumentsAreRefusedWithThePlace)
         for (const auto &[text, says] : parts)
             refuses(std::string(R"({"format_version": 1, )") + text + "}", says);
         refuses(std::string(50000, '['), "nested too deeply");
-        std::string cards = R"({"format_version": 1, "cards": [)";
-        for (int i = 0; i < 300; ++i)
-            cards += R"({"name": "a)" + std::to_string(i) + "\"},";
-        cards.back() = ']';
-        refuses(cards + "}", "cards: not a list of at most 256");
+        json many = Document("{}");
+        for (int i = 0; i < 257; ++i)
+            many["cards"].push_back({{"name", "a" + std::to_string(i)}});
+        refuses(many.dump(), "cards: not a list of at most 256");
+        many.erase("cards");
+        for (int i = 0; i < 257; ++i)
+            many["search"].push_back("a" + std::to_string(i) + ".example");
+        refuses(many.dump(), "search: more than 256");
         EXPECT_EQ(Network(), before);
     });
 }
@@ -400,20 +403,25 @@ TEST_F(NetApply, AFailedChangeLeavesEverythingUnchanged)
         EXPECT_EQ(Network(), before);
 
         // A start script that keeps nothing: only what every one keeps is done.
+        const std::string script = ReadFile("/etc/rc.network");
         WriteFile("/etc/rc.network", "#!/bin/sh\nexit 2\n", 0755);
         const Ran unkept = Apply(good);
         EXPECT_EQ(unkept.status, 1) << unkept;
         EXPECT_THAT(unkept.err, testing::HasSubstr("/etc/rc.network would not keep it"));
         EXPECT_EQ(Network(), before);
         EXPECT_EQ(Apply(Document(R"({"hostname": "attic", "gateway": "192.0.2.9"})")).status, 0);
+        WriteFile("/etc/rc.network", script, 0755);
     });
     ASSERT_TRUE(here_);
     test::Node there("there");
     cable_->Plug(there, "eth0");
     ASSERT_EQ(there.Shell("ifconfig eth0 192.0.2.99 netmask 255.255.255.0 up"), 0);
     here_->Do([] {
-        const Ran used = Apply(Document(R"({"cards": [{"name": "eth0", "address": "192.0.2.99/24"}]})"), {});
-        EXPECT_EQ(used.status, 4) << used;
+        for (const char *card : {R"("address": "192.0.2.99/24")", R"("more_addresses": ["192.0.2.99/24"])"}) {
+            const Ran used =
+                Apply(Document((std::string(R"({"cards": [{"name": "eth0", )") + card + "}]}").c_str()), {});
+            EXPECT_EQ(used.status, 4) << used;
+        }
     });
 }
 

@@ -67,7 +67,10 @@ TEST_F(Net, ShowsWhatWasSet)
         EXPECT_EQ(Tavoctl({"net", "set", "192.0.2.20/25", "--gateway", "192.0.2.99"}).status, 0);
         EXPECT_EQ(Tavoctl({"net", "dns", "192.0.2.53", "2001:db8::53"}).status, 0);
         EXPECT_EQ(Tavoctl({"net", "hostname", "attic"}).status, 0);
+        EXPECT_EQ(Tavoctl({"net", "hostname", "--dry-run", "cellar"}).status, 0);
         EXPECT_EQ(Tavoctl({"net", "mtu", "eth0", "1400"}).status, 0);
+        EXPECT_EQ(Tavoctl({"conf", "set", "eth0_mtu", "1300"}).status, 0);
+        EXPECT_THAT(Tavoctl({"net", "mtu", "eth0", "1400", "--json"}).out, HasSubstr(R"("changed": true)")) << "stored";
         EXPECT_THAT(Tavoctl({"net", "mtu", "eth0", "1400", "--json"}).out, HasSubstr(R"("changed": false)"));
         EXPECT_THAT(Tavoctl({"net", "bond", "--yes", "none", "--json"}).out, HasSubstr(R"("changed": false)"));
         EXPECT_EQ(Tavoctl({"net", "ipv6", "eth0", "on"}).status, 0);
@@ -120,6 +123,7 @@ TEST_F(Net, RefusesWhatCannotBe)
             {{"net", "gateway", "198.51.100.1"}, 1, "is it on the network of an interface?"},
             {{"net", "gateway", "$(reboot)"}, 2, "allowed: the IPv4 address of a host"},
             {{"net", "dns"}, 2, "none was named"},
+            {{"net", "dns", "--none", "192.0.2.53"}, 2, "there are some, and --none"},
             {{"net", "dns", "192.0.2.53", "ns.example"}, 2, "ERR_INVALID_NETNAME"},
             {{"net", "hostname", "0attic"}, 2, "ERR_INVALID_NETNAME"},
             {{"net", "mtu", "eth0", "67"}, 2, "a number from 68 to 65535"},
