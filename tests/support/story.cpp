@@ -6,6 +6,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -34,7 +35,9 @@ Story::~Story()
     if (text_.empty() || testing::Test::IsSkipped())
         return;
     const testing::TestInfo &test = *testing::UnitTest::GetInstance()->current_test_info();
-    const std::string name = std::string("/") + test.test_suite_name() + "." + test.name() + ".txt";
+    std::string name = std::string(test.test_suite_name()) + "." + test.name() + ".txt";
+    std::replace(name.begin(), name.end(), '/', '-');  // of a row: Of/Every.Action/web
+    name.insert(0, "/");
     if (const char *kept = std::getenv("TAVO_KEEP_GOLDEN")) {
         WriteFile(kept + name, text_);
         return;

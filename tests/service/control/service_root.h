@@ -5,6 +5,7 @@
 #include "tavo_file.h"
 #include "tavo_service.h"
 
+#include "support/story.h"
 #include "support/test.h"
 
 #include <sys/mount.h>
@@ -83,16 +84,39 @@ inline void ResetStandins()
         std::filesystem::remove(entry.path(), none);
 }
 
+// Lines of the settings that were not there the last time.
+inline Story::Source ChangedSettings()
+{
+    return [before = std::vector<std::string>()]() mutable {
+        std::vector<std::string> now, changed;
+        std::ifstream file("/etc/tavoinfo.conf");
+        for (std::string line; std::getline(file, line); now.push_back(line)) {
+            if (std::find(before.begin(), before.end(), line) == before.end())
+                changed.push_back("setting " + line);
+        }
+        before = now;
+        return changed;
+    };
+}
+
+// What is switched: each call with its scripts, settings, links, records of shares, and folders on the volumes.
+class Switched : public testing::Test {
+  protected:
+    CapturedLog log_;
+    Story story_{TEST_GOLDEN,
+                 {ScriptCalls, LogOf(log_), ChangedSettings()},
+                 {"/usr/tavo/etc/share.conf", "/var/services", "/volume1", "/volume2", "/volume2/@database"}};
+};
+
 // /volume1 is smaller than /volume2.
-class Services : public testing::Test {
+class Services : public Switched {
   protected:
     void SetUp() override
     {
         if (RootLacks("mount"))
             GTEST_SKIP() << "volumes cannot be mounted here";
         for (const char *volume : {"/volume1", "/volume2"}) {
-            ::mkdir(volume, 0755);
-            if (::mount("tmpfs", volume, "tmpfs", 0, std::strcmp(volume, "/volume1") ? "size=8m" : "size=4m") != 0)
+            if (!Mount(volume))
                 GTEST_SKIP() << volume << " cannot be mounted here: " << std::strerror(errno);
         }
     }
@@ -103,7 +127,30 @@ class Services : public testing::Test {
             ::umount2(volume, MNT_DETACH);
     }
 
-    CapturedLog log_;
+    static bool Mount(const std::string &volume)
+    {
+        ::mkdir(volume.c_str(), 0755);
+        return ::mount("tmpfs", volume.c_str(), "tmpfs", 0, volume == "/volume1" ? "size=4m" : "size=8m") == 0;
+    }
+
+    // What the call returns, and the text that it writes.
+    static std::string Answer(auto call, auto argument)
+    {
+        char text[52] = "";
+        const int result = call(argument, text, sizeof text);
+        return std::to_string(result) + " " + text;
+    }
+
+    static std::string Folder(int id)
+    {
+        TAVOSERVICESHARE share = {};
+        std::ostringstream text;
+        text << TAVOServiceSettingGet(id, &share) << " " << share.szShareName << " at " << share.szVolume << " of "
+             << share.szVolumePath << ", on a volume " << share.fOnVolume << ", special " << share.fSpecialVolume
+             << ", supported " << share.fSupported << ", constants " << share.nId << share.nNaming << share.nAttributeA
+             << share.nAttributeB << share.nReserved;
+        return text.str();
+    }
 };
 
 }  // namespace test
