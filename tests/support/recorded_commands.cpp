@@ -1,6 +1,7 @@
 // Takes the place of the shell.
 #include "support/recorded_commands.h"
 
+#include <csignal>
 #include <cstdlib>
 #include <cstring>
 
@@ -75,7 +76,10 @@ void RecordedCommands::Run(const char *command)
     }
     // The child may share the parent's memory: it frees what it allocates before it ends, and it skips the leak check
     // that a sanitizer puts into _exit.
-    ::syscall(SYS_exit_group, Reply(command));
+    const int status = Reply(command);
+    if (status < 0)
+        ::kill(::getpid(), -status);
+    ::syscall(SYS_exit_group, status);
     __builtin_unreachable();
 }
 

@@ -11,7 +11,7 @@
 namespace test {
 
 struct CommandReply {
-    int status = 0;
+    int status = 0;           // below 0: a signal of that number kills it
     std::string output = {};  // at most the size of a pipe, 64 KiB
 };
 

@@ -128,7 +128,8 @@ TEST_F(Drives, CommandsOfTheAtaInterface)
     unsigned char data[512];
     TELL(ata_command_interface(3, 7, data));
     TELL(ata_command_interface(3, 8, data));
-    TELL(ata_command_interface(3, 1, nullptr));
+    for (const int command : {1, 4, 5, 7, 9})
+        TELL(ata_command_interface(3, command, nullptr));
     // What a kernel without this command answers.
     fail_ = {"cmd none", "cmd e0 00 00 00"};
     fail_errno_ = EINVAL;
@@ -145,10 +146,14 @@ TEST_F(Drives, CommandsOfTheOtherInterface)
         story_.Head("command " + std::to_string(command));
         TELL(marvell_command_interface(3, command, data));
     }
+    for (const int command : {1, 4, 5, 7, 9})
+        TELL(marvell_command_interface(3, command, nullptr));
     unsigned char state = 1;
     power_ = 0;
     EXPECT_EQ(marvell_command_interface(3, 4, &state), 0);
     EXPECT_EQ(state, 0);
+    fail_ = {"scsi 85 06 20 00 00 00 00 00 00 00 00 00 00 00 e7 00"};
+    TELL(marvell_command_interface(3, 9, nullptr));
 }
 
 TEST_F(Drives, RawOpenTakesDisksOnly)
@@ -298,21 +303,21 @@ TEST_F(Drives, SmartData)
 
 TEST_F(Drives, SolidStateAndSticks)
 {
-    EXPECT_EQ(TAVODiskIsSSD("/dev/sda"), 0);
+    TELL(TAVODiskIsSSD("/dev/sda"));
     page_[83 * 2 + 1] = 0x40;
-    EXPECT_EQ(TAVODiskIsSSD("/dev/sda"), 1);
+    TELL(TAVODiskIsSSD("/dev/sda"));
     fail_ = {"cmd ec 01 00 01"};
-    EXPECT_EQ(TAVODiskIsSSD("/dev/sda"), -1);
+    TELL(TAVODiskIsSSD("/dev/sda"));
 
     std::string sector(512, 0);
     sector.replace(0, 3, "\xEB\x58\x90");
     sector.replace(82, 5, "FAT32");
     sector.replace(510, 2, "\x55\xAA");
     tree_.Put("/dev/sdk", sector);
-    EXPECT_EQ(TAVOIsUSBDiskFATNoPartition("/dev/sdk"), 1);
+    TELL(TAVOIsUSBDiskFATNoPartition("/dev/sdk"));
     tree_.Put("/dev/sdk", sector.substr(0, 511));
-    EXPECT_EQ(TAVOIsUSBDiskFATNoPartition("/dev/sdk"), 0);
-    EXPECT_EQ(TAVOIsUSBDiskFATNoPartition(nullptr), 0);
+    TELL(TAVOIsUSBDiskFATNoPartition("/dev/sdk"));
+    TELL(TAVOIsUSBDiskFATNoPartition(nullptr));
 }
 
 }  // namespace

@@ -63,26 +63,26 @@ TEST_F(Lvm, Readers)
     }
     const LVMVGLIST node = {info, nullptr};
     LVMVGINFO *found = nullptr;
-    const struct {
-        const char *vg, *pv;
-        int result;
-    } rows[] = {{"/dev/vg0", nullptr, 1},
-                {nullptr, "/dev/md3", 1},
-                {"/dev/vg1", "/dev/md3", 1},
-                {"/dev/vg1", "/dev/md4", 0},
-                {nullptr, nullptr, 0}};
-    for (const auto &row : rows) {
+    const std::pair<LVMVGKEY, int> keys[] = {{{"/dev/vg0", nullptr}, 1},
+                                             {{nullptr, "/dev/md3"}, 1},
+                                             {{"/dev/vg1", "/dev/md3"}, 1},
+                                             {{"/dev/vg1", "/dev/md4"}, 0},
+                                             {{nullptr, nullptr}, 0}};
+    for (const auto &[key, result] : keys) {
         found = nullptr;
-        const LVMVGKEY key = {row.vg, row.pv};
-        EXPECT_EQ(LVMVgSBListSearch(&node, &key, &found), row.result);
-        EXPECT_EQ(found == info, row.result == 1);
+        EXPECT_EQ(LVMVgSBListSearch(&node, &key, &found), result);
+        EXPECT_EQ(found == info, result == 1);
     }
     LVMVgInfoFree(info);
 
-    commands_.Exit(5);
-    TELL(LVMPvSBGet("/dev/md0", &pv));
-    TELL(LVMPvSBEnum(&list));
-    TELL(LVMVgSBGet("/dev/vg0", &vg));
+    LVMVgInfoFree(nullptr);
+    for (const int status : {0, 5, -9}) {
+        commands_.Exit(status);
+        story_.Head("the commands end with " + std::to_string(status));
+        TELL(LVMPvSBGet("/dev/md0", &pv));
+        TELL(LVMPvSBEnum(&list));
+        TELL(LVMVgSBGet("/dev/vg0", &vg));
+    }
     Model("supportraid=no\n");
     TELL(LVMIsSupport());
     TELL(LVMPvSBGet("/dev/md0", &pv));
@@ -93,7 +93,7 @@ TEST_F(Lvm, Readers)
 
 TEST_F(Lvm, ChangesRunExactlyTheseCommands)
 {
-    for (const int status : {0, 5}) {
+    for (const int status : {0, 5, -9}) {
         commands_.Exit(status);
         story_.Head("the commands end with " + std::to_string(status));
         TELL(LVMPvCreate("/dev/md2"));
@@ -104,6 +104,8 @@ TEST_F(Lvm, ChangesRunExactlyTheseCommands)
         TELL(LVMVgRename(nullptr, "vg1", "vg2"));
         TELL(LVMVgRemove("/dev/vg1"));
     }
+    commands_.Fail("/bin/rm");
+    TELL(LVMVgRemove("/dev/vg1"));
     TELL(LVMVgRemove("/dev/md2"));
     TELL(LVMRemove("/dev/vg1", "pv"));
     TELL(LVMVgRename("/dev/vg1", "vg1", nullptr));
@@ -158,7 +160,7 @@ TEST_F(Lvm, RemovesTheVolumeOfOneDeviceAlone)
     const auto query = [](const std::string &device) {
         return "pvs -o pv_name,vg_name,lv_name,origin --noheading --separator : | grep " + device;
     };
-    const std::string lines = "  /dev/md10:vg2:other:\n  /dev/md1:vg1:lv:\n";
+    const std::string lines = "  WARNING: foreign\n  /dev/md10:vg2:other:\n  /dev/md1:vg1:lv:\n";
     commands_.Print({{query("/dev/md1"), lines}, {query("/dev/md3"), lines}, {query("/dev/md10"), lines}});
     tree_.Put("/proc/mounts",
               "/dev/vg1/lv /volume1 ext4 rw 0 0\n/dev/vg1/lvs1 /nowhere/a\\040b ext4 rw 0 0\n"
@@ -170,6 +172,10 @@ TEST_F(Lvm, RemovesTheVolumeOfOneDeviceAlone)
     TELL(LVMGetLVPath("/dev/md10", path, sizeof path));
     story_.Show("path", path);
     TELL(LVMGetLVPath("/dev/md10", path, 14));
+    TELL(LVMGetLVPath("/dev/md10", path, 1));
+    tree_.Remove("/proc/mounts");
+    commands_.Print({{query("/dev/md1"), lines}}, 5);
+    TELL(LVMRemoveLV("/dev/md1"));
 }
 
 TEST_F(Lvm, CleansUnusedDisks)

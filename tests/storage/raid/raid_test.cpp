@@ -256,27 +256,23 @@ TEST_F(Raid, EnumByNumber)
 
 TEST_F(Raid, RequestsOfTheAppliancesDriver)
 {
-    const std::pair<int, int> rows[] = {{0, 0}, {1, 0}, {2, 0}, {3, 0}, {0, ENODEV}, {0, ENOTTY}};
+    const struct {
+        int state;
+        int64_t done;
+        int error;
+    } rows[] = {{0, 5, 0}, {1, 5, 0}, {1, 0, 0}, {2, 5, 0}, {3, 5, 0}, {0, 5, ENODEV}, {0, 5, ENOTTY}};
     for (const auto &row : rows) {
         calls_.OnIoctl([&](int, unsigned long request, void *argument) {
-            EXPECT_EQ(request, 0x80040961u);
-            *static_cast<int *>(argument) = row.first;
-            errno = row.second;
-            return row.second ? -1 : 0;
+            const RAIDPROGRESS answer = {row.state, row.done, int64_t{1} << 40};
+            EXPECT_TRUE(request == 0x80040961u || request == 0x80140960u) << request;
+            std::memcpy(argument, &answer, request == 0x80040961u ? 4 : 20);
+            errno = row.error;
+            return row.error ? -1 : 0;
         });
+        story_.Head("state " + std::to_string(row.state) + ", errno " + std::to_string(row.error));
         int status = -9;
-        story_.Head("answer " + std::to_string(row.first) + ", errno " + std::to_string(row.second));
         TELL(RAIDIoctlStatus(0, &status));
         story_.Show("status", status);
-    }
-    const std::pair<int, int64_t> progress_rows[] = {{0, 5}, {1, 5}, {1, 0}};
-    for (const auto &row : progress_rows) {
-        calls_.OnIoctl([&](int, unsigned long request, void *argument) {
-            EXPECT_EQ(request, 0x80140960u);
-            const RAIDPROGRESS answer = {row.first, row.second, int64_t{1} << 40};
-            std::memcpy(argument, &answer, 20);
-            return 0;
-        });
         RAIDPROGRESS progress = {};
         TELL(RAIDRebuildStatusGet(0, &progress));
         story_.Show("state", progress.nState);
@@ -300,6 +296,7 @@ TEST_F(Raid, WaitsForTheRebuild)
     TELL(RAIDRebuildingWait("/dev/md5"));
     calls_.OnIoctl(Put(5, 3, {6, 6, 0}));
     TELL(RAIDRebuildingWait("/dev/md5"));  // all members are there and nothing happens
+    TELL(RAIDRebuildingWait("/dev/md7"));
     const List paths = MakeList({"/dev/md7", "/dev/md5"});
     TELL(RAIDRebuildingMultiWait(paths.get()));
 }
@@ -308,23 +305,33 @@ TEST_F(Raid, Superblocks)
 {
     commands_.Print({{"/sbin/mdadm -E /dev/sda3 2>/dev/null", superblock_},
                      {"/sbin/mdadm -E /dev/sdb 2>/dev/null", "Name : nas:101\n"},
-                     {"/sbin/mdadm -E /dev/sdc 2>/dev/null", "Name : nas:100\n"}},
+                     {"/sbin/mdadm -E /dev/sdc 2>/dev/null", "Name : nas:100\n"},
+                     {"/sbin/mdadm -E /dev/sde 2>/dev/null", "Name : nas:7\nVersion : 1\nEvents : 5\n"},
+                     {"/sbin/mdadm -E /dev/sdf 2>/dev/null", "Name : nas:8\nDevice Role : Journal\nEvents : 5\n"},
+                     {"/sbin/mdadm -E /dev/sdg 2>/dev/null", "Name : nas:9\nthis is\nEvents : 5\n"}},
                     1);
     RAIDSUPERBLOCK superblock;
-    for (const char *path : {"/dev/sda3", "/dev/sdd"}) {
+    for (const char *path : {"/dev/sda3", "/dev/sdd", "/dev/sde", "/dev/sdf", "/dev/sdg"}) {
         TELL(RAIDSBGet(path, &superblock));
         story_.Show("array", superblock.szArray);
+        story_.Show("events", superblock.nEvent);
     }
     const List members = MakeList({"/dev/sdd", "/dev/sda3", "/dev/sdb"});
     RAIDSBENTRY *entries = nullptr;
     TELL(RAIDSBEnum(members.get(), &entries));
     story_.Show("member", entries->szMember);
     std::free(entries);
+    TELL(RAIDSBEnum(MakeList({"/dev/sdd"}).get(), &entries));
+    EXPECT_EQ(entries, nullptr);
     for (const char *disk : {"/dev/sda", "/dev/sdb", "/dev/sdc", "/dev/sdd"}) {
         int array = -9;
         TELL(RAIDDiskIsUsedByRAID(disk, &array));
         story_.Show("array", array);
     }
+    commands_.Exit(-9);
+    TELL(RAIDSBGet("/dev/sda3", &superblock));
+    TELL(RAIDSBEnum(members.get(), &entries));
+    TELL(RAIDDiskIsUsedByRAID("/dev/sda", nullptr));
 }
 
 TEST_F(Raid, CleansTheMembersOfOneArrayAlone)
@@ -393,6 +400,8 @@ TEST_F(Raid, CreateRunsExactlyTheseCommands)
     request.nSlot = 3;
     commands_.Exit(1);
     TELL(RAIDCreate(&request));
+    request.fLevel = 3;
+    TELL(RAIDCreate(&request));
 }
 
 TEST_F(Raid, ChangesRunExactlyTheseCommands)
@@ -404,7 +413,7 @@ TEST_F(Raid, ChangesRunExactlyTheseCommands)
     RAIDMEMBER second = {"/dev/sdb3", 1, nullptr};
     RAIDMEMBER first = {"/dev/sda3", 1, &second};
     const RAIDINFO members = Record(RAID_LEVEL_5, &first);
-    for (const int status : {0, 2}) {
+    for (const int status : {0, 2, -9}) {
         commands_.Exit(status);
         story_.Head("the commands end with " + std::to_string(status));
         TELL(RAIDAdd(&raid5, "/dev/sdd3"));
@@ -419,6 +428,7 @@ TEST_F(Raid, ChangesRunExactlyTheseCommands)
         TELL(TAVORAIDMdStripeCacheSizeSet("/dev/md5", 512));
         TELL(TAVORAIDMdStripeCacheSizeSet("/dev/md6", 512));  // an array without such a cache
         TELL(RAIDBadSectorRemap("/dev/md5", 3));
+        TELL(RAIDBadSectorRemap("/dev/md5", 0));
     }
 }
 
@@ -557,25 +567,30 @@ TEST_F(Raid, RoomToGrow)
         int level;
         uint64_t member_kib;
         const char *limit;
-        uint64_t kib, bytes;
-    } rows[] = {{4, kib - 1, "", kib, kib * 3 * 1024},
-                {4, kib, "", 0, 77},
-                {8, 5, "", kib, kib * 2 * 1024},
-                {2, 5, "raidsizelimit=2048\n", 1024, 1024 * 1024},
-                {1, 5, "", 0, 77},
-                {16, 5, "", 0, 77}};
+    } rows[] = {{4, kib - 1, ""}, {4, kib, ""}, {8, 5, ""}, {2, 5, "raidsizelimit=2048\n"}, {1, 5, ""}, {16, 5, ""}};
+    RAIDINFO info = {};
+    const auto ask = [&] {
+        uint64_t found = 0;
+        TELL(RAIDExpansible(&info, &found));
+        story_.Show("KiB of a member", found);
+        TELL(RAIDSizeUnallocGet(&info, &found));
+        story_.Show("bytes", found);
+    };
     for (const auto &row : rows) {
         Model(row.limit);
-        RAIDINFO info = Record(row.level, &member);
+        info = Record(row.level, &member);
         info.cbArray = 77;
         info.cbMember = row.member_kib * 1024;
-        uint64_t found = 0;
-        EXPECT_EQ(RAIDExpansible(&info, &found), row.kib > 0) << row.level;
-        EXPECT_EQ(found, row.kib);
-        uint64_t bytes = 0;
-        EXPECT_EQ(RAIDSizeUnallocGet(&info, &bytes), 0);
-        EXPECT_EQ(bytes, row.bytes);
+        story_.Head("level " + std::to_string(row.level) + " of " + std::to_string(row.member_kib) + " KiB, '" +
+                    row.limit + "'");
+        ask();
     }
+    info.fLevel = RAID_LEVEL_5;
+    calls_.OnIoctl([](int, unsigned long, void *) {
+        errno = EIO;
+        return -1;
+    });
+    ask();
 }
 
 TEST_F(Raid, StripesAndTuning)
@@ -599,6 +614,14 @@ TEST_F(Raid, MigratesToRaid6)
     const List one = MakeList({"/dev/sdd3"});
     TELL(RAIDMigrate2RAID6(&info, two.get()));
     TELL(RAIDMigrate2RAID6(&info, one.get()));
+    for (const char *failing : {"echo raid6", "-a /dev/sdd3", "-a /dev/sde3", "--grow"}) {
+        commands_.Fail(failing);
+        story_.Head(failing + std::string(" fails"));
+        TELL(RAIDMigrate2RAID6(&info, two.get()));
+    }
+    commands_.Exit(0);
+    calls_.OnIoctl(Put(6, 3, {6, 6, 1}));
+    TELL(RAIDMigrate2RAID6(&info, two.get()));  // it is not rebuilt
     // The level cannot be changed back.
     PutNodes({"sde3"});
     Size(info.cbMember - 512);
@@ -715,6 +738,8 @@ TEST_F(Raid, RemoveStopsAndCleans)
     commands_.Print({{"/bin/grep sd /proc/partitions", "   8        3      76800 sda3\n"},
                      {"/sbin/mdadm -E /dev/sda3 2>/dev/null", superblock_}});
     const List paths = MakeList({"/dev/md9", "/dev/md5"});
+    TELL(RAIDRemoveMultiple(paths.get()));
+    commands_.Fail("-S");
     TELL(RAIDRemoveMultiple(paths.get()));
 }
 
