@@ -260,42 +260,39 @@ TEST(PartitionsOnAnImage, EveryLayoutIsRecognisedAfterItsCreation)
     if (test::RootLacks("foreign-exec"))
         GTEST_SKIP() << "writes to /dev/sda: only in an appliance root that runs the partitioning tool";
     const test::CapturedLog log;
-    // The second is larger than an MS-DOS table describes, so its table keeps a copy in the last 33 sectors.
-    const struct {
-        uint64_t sectors, end;
-    } disks[] = {{8 << 21, 8 << 21}, {5860533168, 5860533168 - 33}};
+    test::Story story_{TEST_GOLDEN, {}};
     for (size_t i = 0; i < 2 * std::size(grgAllTavoPartLayout); ++i) {
-        const TAVOPARTLAYOUT &layout = grgAllTavoPartLayout[i / 2];
-        const auto &disk = disks[i % 2];
-        test::WriteFile("/etc.defaults/tavoinfo.conf", layout.fRaid ? "supportraid=yes\n" : "supportraid=no\n");
+        // The second is larger than an MS-DOS table describes, so its table keeps a copy in the last 33 sectors.
+        const off_t sectors = i % 2 == 0 ? 8 << 21 : off_t{5860533168};
+        const int version = grgAllTavoPartLayout[i / 2].nVersion;
+        const int raid = static_cast<int>(grgAllTavoPartLayout[i / 2].fRaid);
+        test::WriteFile("/etc.defaults/tavoinfo.conf", raid ? "supportraid=yes\n" : "supportraid=no\n");
         test::WriteFile("/dev/sda", "");
-        ASSERT_EQ(::truncate("/dev/sda", static_cast<off_t>(disk.sectors * 512)), 0);
-        const int raid = static_cast<int>(layout.fRaid);
-        const int version = layout.nVersion;
-        EXPECT_EQ(BlTAVOCheckPartitionLayout("/dev/sda", raid, nullptr), 0);
-        EXPECT_EQ(PartitionCreate("/dev/sda", PARTITION_DATA, &version), -1) << "no table yet";
-        ASSERT_EQ(PartitionCreate("/dev/sda", PARTITION_SYSTEM, &version), 0);
-        ASSERT_EQ(PartitionCreate("/dev/sda", PARTITION_DATA, &version), 0);
+        ASSERT_EQ(::truncate("/dev/sda", sectors * 512), 0);
         int found = 0;
-        EXPECT_EQ(BlTAVOCheckPartitionLayout("/dev/sda", raid, &found), 1);
-        EXPECT_EQ(found, version);
-        EXPECT_EQ(BlTAVOCheckPartitionLayout("/dev/sda", 1 - raid, &found), 0);
+        const auto check = [&](int with_raid) {
+            TELL(BlTAVOCheckPartitionLayout("/dev/sda", with_raid, &found));
+        };
+        story_.Head("version " + std::to_string(version) + (raid ? " with RAID, " : ", ") + std::to_string(sectors));
+        check(raid);
+        TELL(PartitionCreate("/dev/sda", PARTITION_DATA, &version));  // no table yet
+        TELL(PartitionCreate("/dev/sda", PARTITION_SYSTEM, &version));
+        TELL(PartitionCreate("/dev/sda", PARTITION_DATA, &version));
+        check(1 - raid);
+        check(raid);
+        story_.Show("version", found);
         int64_t start = 0;
         uint32_t type = 0;
-        const int64_t data = RCPartitionConfigs(3, "/dev/sda", &start, &type);
-        EXPECT_EQ(start, static_cast<int64_t>(layout.place2.nStart + layout.place2.cSector +
-                                              static_cast<int64_t>(layout.cGap)));
-        EXPECT_EQ(static_cast<uint64_t>(start + data), disk.end);
-        EXPECT_EQ(type, layout.place3.nType);
-        int kind = 0;
-        EXPECT_EQ(PartitionTableTypeGet("/dev/sda", &kind), 0);
-        EXPECT_EQ(kind, i % 2 == 0 ? PARTITION_TABLE_MBR : PARTITION_TABLE_GPT);
-        PartitionClean("/dev/sda", PARTITION_DATA);
-        EXPECT_EQ(RCPartitionConfigs(3, "/dev/sda", nullptr, nullptr), -1);
-        EXPECT_EQ(BlTAVOCheckPartitionLayout("/dev/sda", raid, nullptr), 1)
-            << "the system's partitions are still there";
-        EXPECT_EQ(PartitionClean("/dev/sda", PARTITION_SYSTEM), 0);
-        EXPECT_EQ(BlTAVOCheckPartitionLayout("/dev/sda", raid, nullptr), 0);
+        TELL(RCPartitionConfigs(3, "/dev/sda", &start, &type));
+        story_.Show("start", start);
+        story_.Show("type", type);
+        TELL(PartitionTableTypeGet("/dev/sda", &found));
+        story_.Show("table", found);
+        TELL(PartitionClean("/dev/sda", PARTITION_DATA));
+        TELL(RCPartitionConfigs(3, "/dev/sda", nullptr, nullptr));
+        check(raid);
+        TELL(PartitionClean("/dev/sda", PARTITION_SYSTEM));
+        check(raid);
     }
     ::unlink("/dev/sda");
 }
