@@ -1,7 +1,5 @@
 // What mdadm and the LVM tools print, and what becomes the name of an array, a group or a volume.
 #include "core/detail/text_fields.h"
-#include "storage/detail/array_level.h"
-#include "storage/detail/array_members.h"
 #include "storage/detail/array_name.h"
 #include "storage/detail/lvm_line.h"
 #include "storage/detail/mdadm_examine.h"
@@ -83,16 +81,6 @@ TEST(MdadmExamine, Lines)
     EXPECT_EQ(std::string(Examine(longest).szUuid).size(), 63u);
 }
 
-TEST(ArrayUuid, OnlyWholeOnesAreEqual)
-{
-    const std::string uuid = "99a1cb1e:1aaa3c52:49268cdc:b4e6580a";
-    EXPECT_TRUE(tavo::IsSameArrayUuid(uuid, "99A1CB1E:1aaa3c52:49268cdc:b4e6580a"));
-    EXPECT_FALSE(tavo::IsSameArrayUuid(uuid, "99a1cb1e:1aaa3c52:49268cdc:b4e6580b"));
-    for (const char *none :
-         {"", "99a1cb1e", "99a1cb1e:1aaa3c52:49268cdc:b4e6580", "99a1cb1e-1aaa3c52-49268cdc-b4e6580a"})
-        EXPECT_FALSE(tavo::IsSameArrayUuid(none, none)) << none;
-}
-
 TEST(ArrayName, Numbers)
 {
     EXPECT_EQ(tavo::ArrayNumber("/dev/md0"), 0);
@@ -101,18 +89,6 @@ TEST(ArrayName, Numbers)
                             "/dev/md1p1", "/dev/md+1"})
         EXPECT_EQ(tavo::ArrayNumber(bad), std::nullopt) << bad;
     EXPECT_EQ(tavo::ArrayFile(2, "md/level"), "/sys/block/md2/md/level");
-}
-
-TEST(MemberState, OfTheKernelsBits)
-{
-    EXPECT_EQ(tavo::MemberState(0x6, false), RAID_MEMBER_ACTIVE);
-    EXPECT_EQ(tavo::MemberState(0x0, false), RAID_MEMBER_SPARE);
-    EXPECT_EQ(tavo::MemberState(0x2, false), RAID_MEMBER_SPARE) << "still being rebuilt";
-    EXPECT_EQ(tavo::MemberState(0x1, false), RAID_MEMBER_FAILED);
-    EXPECT_EQ(tavo::MemberState(0x1, true), RAID_MEMBER_FATAL);
-    EXPECT_EQ(tavo::LevelOfKernel(4), std::nullopt);
-    EXPECT_FALSE(tavo::IsRebuildAction("check")) << "a scrub";
-    EXPECT_TRUE(tavo::IsRebuildAction("recover"));
 }
 
 std::string Text(const std::optional<LVMPV> &pv)

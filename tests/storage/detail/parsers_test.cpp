@@ -1,7 +1,5 @@
 // What the kernel's files, the drives' pages and the partitioning tool say, and what becomes a name in a path or
 // command.
-#include "tavo_partition.h"
-
 #include "core/detail/text_fields.h"
 #include "storage/detail/ata_pass_through.h"
 #include "storage/detail/boot_sector.h"
@@ -12,7 +10,6 @@
 #include "storage/detail/member_node.h"
 #include "storage/detail/proc_partitions.h"
 #include "storage/detail/sfdisk_line.h"
-#include "storage/detail/usb_id.h"
 #include "support/captures.h"
 #include "support/test.h"
 
@@ -137,23 +134,6 @@ TEST(DrivePage, KnowsDrivesWithoutRotatingMedium)
     }
 }
 
-TEST(BootSector, KindOfTheTable)
-{
-    const auto sector_with = [](std::initializer_list<int> guid_entries) {
-        tavo::BootSector sector = {};
-        sector[510] = 0x55, sector[511] = 0xAA;
-        for (const int entry : guid_entries)
-            sector[static_cast<size_t>(446 + 16 * (entry - 1) + 4)] = 0xEE;
-        return sector;
-    };
-    EXPECT_EQ(tavo::TableKind({}), PARTITION_TABLE_NONE);
-    EXPECT_EQ(tavo::TableKind(sector_with({})), PARTITION_TABLE_MBR);
-    EXPECT_EQ(tavo::TableKind(sector_with({1})), PARTITION_TABLE_GPT);
-    EXPECT_EQ(tavo::TableKind(sector_with({2})), PARTITION_TABLE_GPT);
-    EXPECT_EQ(tavo::TableKind(sector_with({3})), PARTITION_TABLE_MBR) << "entry 3 is not looked at";
-    EXPECT_EQ(tavo::TableKind(sector_with({4})), PARTITION_TABLE_GPT);
-}
-
 TEST(BootSector, FileSystemsWithoutTable)
 {
     const struct {
@@ -234,13 +214,6 @@ TEST(CachingPage, IsFoundAfterTheBlockDescriptor)
     mode_data[13] = 30;
     EXPECT_FALSE(tavo::FindCachingPage(mode_data)) << "longer than the answer";
     EXPECT_FALSE(tavo::FindCachingPage({}));
-}
-
-TEST(UsbId, FourDigits)
-{
-    EXPECT_EQ(tavo::ParseUsbId("05ac\n"), 0x05ACu);
-    for (const char *bad : {"", "5ac", "05acx", "0x5a", "05ac1", " 5ac"})
-        EXPECT_FALSE(tavo::ParseUsbId(bad)) << bad;
 }
 
 // The kernel's numbers of disks: sixteen to a major number, in three runs of them.
