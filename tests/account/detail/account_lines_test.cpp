@@ -206,7 +206,7 @@ TEST(CommitMarker, ReadsWhatItWrites)
     EXPECT_TRUE(marker.IsEmpty());
     marker.files = {{tavo::kSambaLists, "/tmp/a b", "/etc/x%", "1:2:3.4", "-"}};
     EXPECT_FALSE(marker.HasMoreThanFiles() || marker.IsEmpty());
-    marker.names = {{true, 6, 0, "old name", ""}, {false, 9, 0, "a", "b"}};
+    marker.names = {{true, 6, 0, "%old name", ""}, {false, 9, 0, "a", "b"}};
     EXPECT_FALSE(marker.HasMoreThanFiles());
     marker.MakePending(tavo::kShareLists);
     EXPECT_TRUE(marker.HasMoreThanFiles());
@@ -215,13 +215,13 @@ TEST(CommitMarker, ReadsWhatItWrites)
         {Home::kMake, "a", "", 1000, 100, 0}, {Home::kMove, "a", "b", -1, -1, 7}, {Home::kRemove, "c", "", -1, -1, 0}};
     marker.stages = {"/volume1/@tmp/\x7F\xC3\xA4!"};
     const std::string text = "file 1 /tmp/a%20b /etc/x%25 1:2:3.4 -\n"
-                             "name group 6 2 old%20name %\nname user 9 0 a b\n"
+                             "name group 6 2 %25old%20name %\nname user 9 0 a b\n"
                              "home make a % 1000 100 0\nhome move a b -1 -1 7\nhome remove c % -1 -1 0\n"
                              "stage /volume1/@tmp/%7F\xC3\xA4!\nend\n";
     EXPECT_EQ(tavo::FormatMarker(marker), text);
     tavo::Marker read;
     ASSERT_TRUE(tavo::ParseMarker(text + "after\n", read));
-    EXPECT_EQ(read.names[0].old_name + "|" + read.names[0].new_name, "old name|");
+    EXPECT_EQ(read.names[0].old_name + "|" + read.names[0].new_name, "%old name|");
     EXPECT_EQ(tavo::FormatMarker(read), text);
     read.DropDone();
     ASSERT_EQ(read.names.size(), 1u);
@@ -233,6 +233,8 @@ TEST(CommitMarker, ReadsWhatItWrites)
         EXPECT_TRUE(read.IsEmpty()) << line;
     }
     EXPECT_FALSE(tavo::ParseMarker(text.substr(0, text.size() - 4), read)) << "cut short";
+    ASSERT_TRUE(tavo::ParseMarker("stage /a%4\nstage /b%zz\nstage %41%\nend\n", read));
+    EXPECT_EQ(read.stages, (std::vector<std::string>{"/a4", "/bzz", "A"})) << "what is not a byte's number";
 
     // A second one takes the place of the first, and only root's counts.
     for (const bool durable : {false, true}) {
@@ -260,9 +262,11 @@ TEST(CommitMarker, ReadsWhatItWrites)
 
 TEST(GroupTexts, TheGroupOfAllUsersHasNoMembersOfItsOwn)
 {
-    const auto stores = tavo::GroupStoreEntries("users:x:100:ghost,a\nstaff:x:7:a\n", "");
+    const auto stores =
+        tavo::GroupStoreEntries("users:x:100:ghost,a\nstaff:x:7:a\n", "staff\n:x\nstaff:a\0b\nSTAFF:1\nstaff:2\n"s);
     EXPECT_EQ(Value(stores[tavo::kGroupNameStore], "USERS"), "users:x:100:\0"s);
     EXPECT_EQ(Value(stores[tavo::kGroupNameStore], "STAFF"), "staff:x:7:a\0"s);
+    EXPECT_EQ(Value(stores[tavo::kDescStore], "STAFF"), "STAFF:1\0"s) << "the first line that is one";
 }
 
 TEST(UserHomes, AStageThatAnotherProcessRemovesIsLeftAlone)

@@ -96,6 +96,7 @@ TEST_F(Groups, EveryChangeInTurn)
     ::chmod("/etc/group", 0640);
     TELL(AddGroup("Staff", -1, {"bob", "nobody", "", "alice"}));
     TELL(AddGroup("early", 500));
+    TELL(AddGroup("EARLIER", 500));  // of two with one id the first has the index
     TELL(TAVOGroupDescSet("STAFF", "Those who work, 100%"));
     TELL(TAVOGroupDescSet("early", "Those who rise"));
     struct stat st;

@@ -142,7 +142,9 @@ TEST_F(Quota, CleansWhoIsThereOnEveryVolume)
     const test::List alice = test::MakeList({"alice"});
     tree_.Put("/proc/mounts", "/dev/md0 / ext4 rw,usrquota 0 0\n/dev/md2 /volume1 ext4 rw,usrquota,grpquota 0 0\n"
                               "/dev/md3 /volume2 ext4 rw 0 0\n/dev/md4 /volume13 ext4 rw,usrjquota=aquota.user 0 0\n"
-                              "/dev/md5 /volume1/sub ext4 rw,usrquota 0 0\n");
+                              "/dev/md5 /volume1/sub ext4 rw,usrquota 0 0\n/dev/md6 /volume4 ext4 rw,quota 0 0\n"
+                              "/dev/md7 /volume5 xfs rw,uquota 0 0\n/dev/md8 /volume ext4 rw,usrquota 0 0\n"
+                              "/dev/md9 /volume/6 ext4 rw,usrquota 0 0\n/dev/md10 /volume: ext4 rw,usrquota 0 0\n");
     TELL(TAVOQuotaCleanAllVols(alice.get()));
     kernel_errno = EPERM;
     failing_device = "/dev/md2";
