@@ -81,20 +81,16 @@ bool EachAllocation::Next()
 
 void EachAllocation::Arm()
 {
-    armed = {.on = true, .until_failure = round_};
+    StartCounting();
+    FailAllocation(round_);
 }
 
 void EachAllocation::Disarm()
 {
     if (!armed.on)
         return;
-    armed.on = false;
-    fired_ = armed.fired;
-#ifdef TEST_WITH_ASAN
-    left_allocated_ = 0;  // the sanitizer allocates, too, and checks for leaks itself at the end
-#else
-    left_allocated_ = armed.live;
-#endif
+    fired_ = AllocationFailed();
+    left_allocated_ = StopCounting();
 }
 
 bool PauseFailing(bool paused) noexcept
@@ -138,7 +134,7 @@ int StopCounting()
 {
     armed.on = false;
 #ifdef TEST_WITH_ASAN
-    return 0;  // as above
+    return 0;  // the sanitizer allocates, too, and checks for leaks itself at the end
 #else
     return armed.live;
 #endif

@@ -13,49 +13,22 @@ inline const char *const kCanary = "/tmp/canary";
 // 200 and more; none is the name of a device, with or without "/dev/" before it.
 inline std::vector<std::string> HostileNames()
 {
-    const std::string touch = std::string("touch ") + kCanary;
-    const std::vector<std::string> tails = {
-        ";" + touch,
-        "; " + touch + " #",
-        "|" + touch,
-        "||" + touch,
-        "&" + touch,
-        "&&" + touch,
-        "$(" + touch + ")",
-        "`" + touch + "`",
-        "\n" + touch,
-        "\n" + touch + "\n",
-        "\r" + touch,
-        ">" + std::string(kCanary),
-        "<(" + touch + ")",
-        "'" + touch + "'",
-        "';" + touch + ";'",
-        "\";" + touch + ";\"",
-        "\\\n" + touch,
-        "'$(" + touch + ")'",
-        "\"$(" + touch + ")\"",
-        "${IFS}" + touch,
-        " " + touch,
-        "\t" + touch,
-        "*",
-        "?",
-        "[a-z]",
-        "{a,b}",
-        "~root",
-        "\xC3\xA4",
-        "\xE2\x80\xAE",
-        "\xFF\xFE",
-        "\x1B[2J",
-        "/../../etc/passwd",
-        "/..",
-        "#",
-        "!" + touch,
-        "%n%n%n%n \n",
-        std::string(4096, 'a'),
-        std::string(4096, ';'),
-        " --zero-superblock",
-        "\x7F",
-    };
+    // "@" is a command that creates the file.
+    std::vector<std::string> tails = {";@",           "; @ #",    "|@",          "||@",
+                                      "&@",           "&&@",      "$(@)",        "`@`",
+                                      "\n@",          "\n@\n",    "\r@",         "<(@)",
+                                      "'@'",          "';@;'",    "\";@;\"",     "\\\n@",
+                                      "'$(@)'",       "\"$(@)\"", "${IFS}@",     " @",
+                                      "\t@",          "!@",       "*",           "?",
+                                      "[a-z]",        "{a,b}",    "~root",       "\xC3\xA4",
+                                      "\xE2\x80\xAE", "\xFF\xFE", "\x1B[2J",     "/../../etc/passwd",
+                                      "/..",          "#",        "%n%n%n%n \n", " --zero-superblock",
+                                      "\x7F"};
+    tails.insert(tails.end(), {std::string(4096, 'a'), std::string(4096, ';'), std::string(">") + kCanary});
+    for (std::string &tail : tails) {
+        if (const size_t at = tail.find('@'); at != tail.npos)
+            tail.replace(at, 1, std::string("touch ") + kCanary);
+    }
     std::vector<std::string> names = {
         "",      " ",     "\n",      ".",       "..", "-", "--help", "-rf", "../../etc/passwd", "/etc/shadow ",
         "$HOME", "/dev/", "/dev/..", "/dev/./", "//"};

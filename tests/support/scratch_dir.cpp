@@ -13,10 +13,9 @@
 
 namespace test {
 
-ScratchDir::ScratchDir()
+ScratchDir::ScratchDir(const std::string &parent) : path_(parent + "/scratch.XXXXXX")
 {
-    char name[] = "/tmp/scratch.XXXXXX";
-    path_ = ::mkdtemp(name);
+    ::mkdtemp(path_.data());
 }
 
 ScratchDir::~ScratchDir()

@@ -10,7 +10,7 @@ namespace test {
 
 class ScratchDir {
   public:
-    ScratchDir();
+    explicit ScratchDir(const std::string &parent = "/tmp");
     ~ScratchDir();
     ScratchDir(const ScratchDir &) = delete;
     ScratchDir &operator=(const ScratchDir &) = delete;

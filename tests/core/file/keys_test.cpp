@@ -25,7 +25,7 @@ class KeysTest : public test::FileStory {
 
 TEST_F(KeysTest, AreReadWithTheFirstOrTheLastValue)
 {
-    Before("a=1\n#a=0\nb = \"two words\"\nno sign\nempty=\na=3\n=c=4\n\"d\"=5\n");
+    Before("a=1\n#a=0\nb = \"two words\"\nno sign\nempty=\na=3\n|=first slot\n=c=4\n\"d\"=5\n");
     Owned<TLIBSZHASH> last = HashOf({{"kept", "yes"}}), same = HashOf({}), first = HashOf({}), words = HashOf({});
     TELL(TLIBFileGetKeys(path_, nullptr, last, "="));
     ShowPairs(last);

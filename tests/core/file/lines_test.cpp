@@ -63,9 +63,11 @@ TEST_F(LinesTest, AreEdited)
 TEST_F(LinesTest, AreReadIntoAList)
 {
     test::WriteFile(file_, "one\n\n" + std::string(5000, 'x') + "\nend");
-    test::Owned<TLIBSZLIST> list = test::ListOf({"held before"});
+    test::Owned<TLIBSZLIST> list = test::ListOf({});
+    EXPECT_EQ(TLIBFileReadLines(path_, list), 4);
+    test::WriteFile(file_, "more\n");
     EXPECT_EQ(TLIBFileReadLines(path_, list), 5);
-    EXPECT_THAT(test::Items(list), testing::ElementsAre("held before", "one", "", std::string(5000, 'x'), "end"));
+    EXPECT_THAT(test::Items(list), testing::ElementsAre("one", "", std::string(5000, 'x'), "end", "more"));
 }
 
 TEST_F(LinesTest, AByteOrderMarkIsStripped)

@@ -40,7 +40,8 @@ TEST_F(SectionTest, KnowsHeaders)
 
 TEST_F(SectionTest, ReadsTheFirstSectionOfAName)
 {
-    Before("top=0\n[net]x\n[other]\na=9\n[net] \n a = \"1 2\" \nb=1\nb=2\n#c=3\nno sign\n=d\nempty=\ne=x=y\n[broken\n"
+    Before("top=0\n[net]x\n[other]\na=9\n[net] \n|=first slot\n a = \"1 2\" \nb=1\nb=2\n#c=3\nno "
+           "sign\n=d\nempty=\ne=x=y\n[broken\n"
            "lost=1\n[net]\na=second\n");
     Owned<TLIBSZHASH> hash = HashOf({{"kept", "yes"}});
     TELL(TLIBFileGetSection(path_, "net", hash));
@@ -53,10 +54,11 @@ TEST_F(SectionTest, ReadsTheFirstSectionOfAName)
 
 TEST_F(SectionTest, ListsSections)
 {
-    Owned<TLIBSZLIST> list = test::ListOf({"held before"});
+    Owned<TLIBSZLIST> list = test::ListOf({});
     story_.Mask("n{1021}", "(1,021 n)");
     story_.Mask("n{1020}", "(1,020 n)");
     EDIT("[a]\nx=1\n[ b ] \n[broken\n[]\n[c]d]\n[" + std::string(1020, 'n') + "]\n", TLIBFileEnumSection(path_, list));
+    TELL(TLIBFileEnumSection(path_, list));
     story_.Show("list", test::Items(list));
     // A header that is too long sets no code.
     EDIT("[a]\n[" + std::string(1021, 'n') + "]\n[b]\n", TLIBFileEnumSection(path_, list));

@@ -158,6 +158,22 @@ TEST_F(Refusals, Core)
     Refuses("hash_allocator", PshTLIBSzHashAlloc, {1, -1});
     Refuses("hash_allocator", PshTLIBIHashAllocator, {1, -1}, 9);
     Refuses("hash_pair_num:26", TLIBSzHashPairNum, hash_);
+
+    // Without a code.
+    const Refusal silent("", 0, "");
+    Refuses(silent, SzTLIBSzHashGetValue, hash_, "k");
+    Refuses(silent, SzTLIBSzHashRemoveKey, hash_, "k");
+    Refuses(silent, TLIBSzHashSetValue, {&hash_, &no_hash}, "k", "v");
+    Refuses(silent, TLIBSzHashGetLength, hash_);
+    Refuses(silent, TLIBSzHashEnumKey, hash_, {MayBeNull(), nullptr});
+    Refuses(silent, TLIBIGetLookDict, hash_, "k");
+    Refuses(silent, TLIBISetLookDict, hash_, "k");
+    Refuses(silent, TLIBIInsertPair, hash_, {0, -1, 1 << 20}, "k", "v");
+    Refuses(silent, TLIBICopyHash, hash_, hash_);
+    Refuses(silent, PshTLIBICheckSpace, hash_, 1);
+    Refuses(silent, PshTLIBIReSizeHash, hash_, {1, -1}, 1);
+    Refuses(silent, PshTLIBIInsertNewPair, hash_, &number, "k", "v");
+    Refuses(silent, PshTLIBIUpdateValue, hash_, &number, "k", "v");
 }
 
 TEST_F(Refusals, Storage)

@@ -94,30 +94,17 @@ struct Room {
 inline constexpr const char *kScratch = "/etc/skel/tempErrTLIBFileComment";
 
 // A folder in which rewrites are tried.
-class Place {
+class Place : public ScratchDir {
   public:
-    explicit Place(const std::string &parent) : path_(parent + "/rewritten")
-    {
-        std::filesystem::create_directories("/etc/skel");
-        std::filesystem::create_directory(path_);
-    }
-    ~Place() { std::filesystem::remove_all(path_); }
-    Place(const Place &) = delete;
-    Place &operator=(const Place &) = delete;
+    explicit Place(const std::string &parent) : ScratchDir(parent) { std::filesystem::create_directories("/etc/skel"); }
 
-    std::string operator/(const std::string &name) const { return path_ + "/" + name; }
-    std::set<std::string> Names() const
+    std::vector<std::string> Names() const
     {
-        std::set<std::string> names;
-        for (const auto &entry : std::filesystem::directory_iterator(path_))
-            names.insert(entry.path().filename());
+        std::vector<std::string> names = ScratchDir::Names();
         if (std::filesystem::exists(kScratch))
-            names.insert(kScratch);
+            names.push_back(kScratch);
         return names;
     }
-
-  private:
-    std::string path_;
 };
 
 // Anywhere, and in the appliance root on the file system of /etc/skel, too.
