@@ -1,9 +1,9 @@
 // Scripts the tools that the library runs.
 #include "support/scenario.h"
 
+#include "scripted/quoted_line.h"
+#include "scripted/scenario_dir.h"
 #include "support/test.h"
-#include "support/tools/quoted_line.h"
-#include "support/tools/scenario_dir.h"
 
 namespace test {
 
@@ -58,12 +58,12 @@ Scenario::~Scenario()
 
 ScriptedCall Scenario::Expect(const std::vector<std::string> &words)
 {
-    return ScriptedCall(scenario::AddCall(QuotedLine(words)));
+    return ScriptedCall(scenario::AddCall(scenario::QuotedLine(words)));
 }
 
 ScriptedCall Scenario::ExpectAny(const std::string &tool)
 {
-    return ScriptedCall(scenario::AddCall(QuotedWord(tool) + " ..."));
+    return ScriptedCall(scenario::AddCall(scenario::QuotedWord(tool) + " ..."));
 }
 
 void Scenario::InAnyOrder()

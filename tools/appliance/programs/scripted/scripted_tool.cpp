@@ -14,8 +14,6 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-namespace scenario = test::scenario;
-
 namespace {
 
 const scenario::Call *Choose(const std::vector<scenario::Call> &calls, const std::string &line)
@@ -112,7 +110,7 @@ int Expect(const std::vector<std::string> &words)
     if (i == words.size())
         return 2;
     const std::filesystem::path call =
-        scenario::AddCall(test::QuotedLine({words.begin() + static_cast<long>(i), words.end()}));
+        scenario::AddCall(scenario::QuotedLine({words.begin() + static_cast<long>(i), words.end()}));
     for (const auto &[name, value] : files) {
         if (name == "stdout" || name == "stderr" || name == "run")
             std::filesystem::copy_file(value, call / name);
@@ -154,5 +152,5 @@ int main(int argc, char **argv)
     const std::vector<std::string> words(argv, argv + argc);
     if (std::filesystem::path(words[0]).filename() == "scenario")
         return Command({words.begin() + 1, words.end()});
-    return Called(argv, test::QuotedLine(words));
+    return Called(argv, scenario::QuotedLine(words));
 }

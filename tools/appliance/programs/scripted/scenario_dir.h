@@ -8,8 +8,8 @@
 //   /var/scenario/order   "any" when the calls may come in any order
 //   /var/scenario/log     one line per call: NNN and the call, "-" and the call when it was not expected, "~" and the call
 //                         when there is no scenario and the userland's own tool of that name ran
-#ifndef TESTS_SUPPORT_TOOLS_SCENARIO_DIR_H
-#define TESTS_SUPPORT_TOOLS_SCENARIO_DIR_H
+#ifndef TOOLS_APPLIANCE_SCENARIO_DIR_H
+#define TOOLS_APPLIANCE_SCENARIO_DIR_H
 
 #include <algorithm>
 #include <cstdlib>
@@ -20,7 +20,7 @@
 #include <string_view>
 #include <vector>
 
-namespace test::scenario {
+namespace scenario {
 
 inline const char *const folder = "/var/scenario";
 inline const char *const log_file = "/var/scenario/log";
@@ -113,6 +113,6 @@ inline std::string Complaints()
     return text;
 }
 
-}  // namespace test::scenario
+}  // namespace scenario
 
 #endif

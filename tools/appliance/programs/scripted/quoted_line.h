@@ -1,13 +1,13 @@
 // One argument vector as one line of text, reversible and readable: plain words are unchanged, any other is written as
 // the shell's $'...'. Two vectors are equal when their lines are.
-#ifndef TESTS_SUPPORT_TOOLS_QUOTED_LINE_H
-#define TESTS_SUPPORT_TOOLS_QUOTED_LINE_H
+#ifndef TOOLS_APPLIANCE_QUOTED_LINE_H
+#define TOOLS_APPLIANCE_QUOTED_LINE_H
 
 #include <string>
 #include <string_view>
 #include <vector>
 
-namespace test {
+namespace scenario {
 
 inline std::string QuotedWord(std::string_view word)
 {
@@ -40,6 +40,6 @@ inline std::string QuotedLine(const std::vector<std::string> &words)
     return line;
 }
 
-}  // namespace test
+}  // namespace scenario
 
 #endif
