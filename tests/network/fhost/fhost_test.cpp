@@ -72,6 +72,13 @@ TEST_F(Discovery, TheQueryLeavesTwiceFromEveryCard)
     AddCard("eth0", "192.0.2.10");
     AddCard("eth1", "198.51.100.10");
     TELL(ErrFHOSTSendQueryPkt());
+    // A bond asks for its members, whatever they have.
+    AddCard("bond0", "192.0.2.9");
+    for (const char *member : {"eth0", "eth1"})
+        tree_.Put(std::string("/sys/class/net/") + member + "/master", "");
+    TELL(ErrFHOSTSendQueryPkt());
+    for (const char *gone : {"eth0/master", "eth1/master", "bond0"})
+        tree_.Remove(std::string("/sys/class/net/") + gone);
     // Ten cards are more than are asked.
     for (int i = 0; i < 10; ++i)
         AddCard("eth" + std::to_string(i), "192.0.2." + std::to_string(10 + i));

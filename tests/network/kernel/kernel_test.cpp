@@ -4,6 +4,7 @@
 #include "network/card_record.h"
 #include "support/container_text.h"
 #include "support/network_scene.h"
+#include "support/own_child.h"
 #include "support/test.h"
 
 using test::Card;
@@ -65,6 +66,26 @@ TEST_F(Kernel, HasTheAddressAndTheRoutesThatWereSet)
     EXPECT_THAT(here_->Output("ip route"),
                 AllOf(HasSubstr("default via 192.0.2.99"), HasSubstr("192.0.2.0/25 dev eth0")));
     EXPECT_EQ(here_->Shell("ping -c 1 -w 5 192.0.2.99 >/dev/null"), 0);
+}
+
+TEST_F(Kernel, AsksWhoHasAnAddressBeforeItIsTaken)
+{
+    ASSERT_EQ(there_->Shell("echo 1 >/proc/sys/net/ipv4/icmp_echo_ignore_all"), 0);
+    here_->Do([] {
+        EXPECT_EQ(SetStatic("192.0.2.10"), 0);
+        EXPECT_EQ(TAVONetAddressProbe("eth0", "192.0.2.99", 20), 1);
+        EXPECT_EQ(TAVONetAddressProbe("eth0", "192.0.2.98", 20), 0);
+        EXPECT_EQ(TAVONetAddressProbe("eth0", "192.0.2.10", 20), 0) << "our own";
+        EXPECT_EQ(TAVONetAddressProbe("eth7", "192.0.2.98", 20), -1);
+        EXPECT_EQ(TLIBErrGet(), ERR_FILE_NOT_FOUND);
+    });
+    // Of two that want it at the same time not both get it.
+    const auto finds_it_free = [](const Node &node) {
+        return node.Run([] { return TAVONetAddressProbe("eth0", "192.0.2.50", 300) == 0; });
+    };
+    test::OwnChild other([&] { ::_exit(finds_it_free(*there_) ? 1 : 0); });
+    const bool free = finds_it_free(*here_);
+    EXPECT_FALSE(free && other.Status() != 0);
 }
 
 // ifconfig sets a mask where the kernel has the first address just then, which may be another one.

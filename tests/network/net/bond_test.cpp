@@ -81,7 +81,7 @@ class Bond : public Cards {
 
     static constexpr const char *kUndo = "/var/undo";
     static constexpr const char *kCalls = "/var/standin/rc.log";
-    test::Story story_{TEST_GOLDEN, {NetworkCalls, test::LogOf(log_)}, {kScripts, kUndo}};
+    test::Story story_{TEST_GOLDEN, {NetworkCalls, test::LogOf(log_), test::CallsOf(calls_, "f")}, {kScripts, kUndo}};
 };
 
 TEST_F(Bond, IsMadeChangedAndDissolved)
@@ -192,21 +192,23 @@ TEST_F(Bond, RecordsThatMakeNoSenseAreRefused)
 TEST_F(Bond, IsReadFromTheKernel)
 {
     TAVONETLINKAGGR record;
-    const auto get = [&] {
+    const auto get = [&](const char *mode = "", const char *members = "eth0 eth1\n") {
+        if (*mode)
+            KernelHas(mode, members);
+        story_.Head(mode);
         TELL(TAVONetLinkAggrGet("bond0", &record));
         story_.Show("mode", record.nMode);
         story_.Show("members", record.nMember);
     };
     get();
-    KernelHas("802.3ad 4\n", "eth0 eth1\n");
-    get();
+    for (const char *mode : {"active-backup 1\n", "balance-alb 6", "802.3ad 4\n"})
+        get(mode);
     story_.Show("second", record.rgszMember[1]);
     test::List list = test::MakeList({});
     TELL(test::Moving(list, TAVONetLinkAggrEnum));
     TELL(test::Moving(list, [](auto **addr) { return TAVONetLinkAggrPhyGet("bond0", addr); }));
     story_.Show("list", test::Items(list.get()));
-    KernelHas("balance-rr 0\n", "");
-    get();
+    get("balance-rr 0\n", "");
 }
 
 TEST_F(Bond, MembersAreAddedOnceAndOnlyCards)

@@ -138,30 +138,6 @@ TEST_F(Daemons, AreFoundByABoxWithTwoPorts)
           all);
 }
 
-TEST_F(Daemons, AreFoundByABondWithOneLeg)
-{
-    StartAll();
-    Node asker("asker");
-    if (asker.Shell("ip link add bond0 type bond 2>/dev/null") != 0)
-        GTEST_SKIP() << "this kernel has no bonds";
-    test::VirtualCable second("second");
-    second.Plug(asker, "eth0");
-    cable_->Plug(asker, "eth1");
-    ASSERT_EQ(asker.Shell("rm -f /etc/sysconfig/network-scripts/* && mount -o remount,rw /sys && "
-                          "cd /sys/class/net/bond0/bonding && echo active-backup >mode && echo 100 >miimon && "
-                          "echo +eth0 >slaves && echo +eth1 >slaves && "
-                          "ifconfig bond0 192.0.2.9 netmask 255.255.255.0 up"),
-              0);
-    ASSERT_EQ(ShellStatus("ip link set second0 down"), 0) << "the cable is cut";
-    asker.Do([] {
-        EXPECT_TRUE(Eventually([] { return ReadFile("/sys/class/net/bond0/bonding/active_slave") == "eth1\n"; }));
-        int result = -1;
-        EXPECT_THAT(Discover(3, &result),
-                    UnorderedElementsAre("nas1(192.0.2.1)", "nas2(192.0.2.2)", "nas3(192.0.2.3)"));
-        EXPECT_EQ(result, 0);
-    });
-}
-
 // What follows looks at the processes of the node in which it runs.
 std::string Status(const std::string &pid, const std::string &field)
 {
