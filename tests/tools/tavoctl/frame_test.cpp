@@ -1,6 +1,6 @@
 // The common parts of all verbs of tavoctl: exit statuses, refusals, tables and JSON, failures, questions, completion.
 
-#include "run_tavoctl.h"
+#include "command_story.h"
 #include "support/test.h"
 #include "support/text_lines.h"
 
@@ -81,24 +81,10 @@ TEST(TavoctlFrame, WrongCommandLinesAreUsageAndSayNothingOnStandardOutput)
 
 TEST(TavoctlFrame, FailureNamesCodePlaceAttemptAndHintOnOneLine)
 {
-    const test::Ran text = Tavoctl({"conf", "get", "no_such_key"});
-    EXPECT_EQ(text.status, 3);
-    EXPECT_THAT(text.err, StartsWith("tavoctl: cannot get no_such_key from /etc/tavoinfo.conf: ERR_KEY_NOT_FOUND "
-                                     "(0x2000); "));
-    EXPECT_THAT(Tavoctl({"conf", "get", "--verbose", "no_such_key"}).err, HasSubstr(" at file_get_key_value:108; "));
-    EXPECT_EQ(test::Lines(text.err).size(), 1u);
-
-    const test::Ran ran = Tavoctl({"conf", "get", "--json", "no_such_key"});
-    EXPECT_EQ(ran.status, 3);
-    EXPECT_EQ(ran.out, "");
-    const json error = json::parse(ran.err).at("error");
-    EXPECT_EQ(error.at("code"), "0x2000");
-    EXPECT_EQ(error.at("name"), "ERR_KEY_NOT_FOUND");
-    EXPECT_EQ(error.at("module"), "file_get_key_value");
-    EXPECT_EQ(error.at("line"), 108);
-    EXPECT_EQ(error.at("status"), 3);
-    EXPECT_EQ(error.at("attempted"), "get no_such_key from /etc/tavoinfo.conf");
-    EXPECT_NE(error.at("hint"), "");
+    test::CommandStory story({});
+    story.Run({{"conf", "get", "no_such_key"},
+               {"conf", "get", "--verbose", "no_such_key"},
+               {"conf", "get", "--json", "no_such_key"}});
 }
 
 TEST(TavoctlFrame, ForeignMachineIsNotChanged)
@@ -141,17 +127,13 @@ TEST(TavoctlFrame, ForeignMachineIsNotChanged)
 
 TEST(TavoctlFrame, ColumnsAlignByCharacters)
 {
-    const ScratchDir dir;
-    WriteFile(dir / "f", "k=v\nschl\xC3\xBCssel=gr\xC3\xB6\xC3\x9F"
-                         "e\n# comment\nlong_key_name=\n");
-    EXPECT_EQ(Tavoctl({"conf", "list", "--file", dir / "f"}).out, "LINE  KEY            VALUE\n"
-                                                                  "   1  k              v\n"
-                                                                  "   2  schl\xC3\xBCssel      gr\xC3\xB6\xC3\x9F"
-                                                                  "e\n"
-                                                                  "   4  long_key_name  \n");
-    WriteFile(dir / "f", "# nothing\n");
-    EXPECT_EQ(Tavoctl({"conf", "list", "--file", dir / "f"}).out, "LINE  KEY  VALUE\n");
-    EXPECT_EQ(test::Facts({"conf", "list", "--json", "--file", dir / "f"}), json::array());
+    test::CommandStory story({});
+    const std::string file = "/root/columns";
+    WriteFile(file, "k=v\nschl\xC3\xBCssel=gr\xC3\xB6\xC3\x9F"
+                    "e\n# comment\nlong_key_name=\n");
+    story.Run({"conf", "list", "--file", file});
+    WriteFile(file, "# nothing\n");
+    story.Run({{"conf", "list", "--file", file}, {"conf", "list", "--json", "--file", file}});
 }
 
 TEST(TavoctlFrame, ControlCharactersNeverReachATerminal)
@@ -303,21 +285,16 @@ TEST(TavoctlFrame, ColoursAndThePagerAreForTerminals)
 
 TEST(TavoctlFrame, MistypedWordsAreSuggested)
 {
-    const struct {
-        Words words;
-        int status;
-        const char *suggestion;
-    } cases[] = {
-        {{"cnof", "get"}, 2, "did you mean conf?"},
-        {{"conf", "gte"}, 2, "did you mean get?"},
-        {{"conf", "get", "--defautls", "x"}, 2, "did you mean --defaults?"},
-        {{"conf", "get", "runsmaba"}, 3, "did you mean runsamba?"},
-        {{"lock", "run", "tavoinof", "--", "true"}, 2, "did you mean tavoinfo?"},
-        {{"error", "explain", "ERR_KEY_NOT_FUOND"}, 3, "did you mean ERR_KEY_NOT_FOUND?"},
-        {{"error", "list", "--output", "nam"}, 2, "did you mean name?"},
-    };
-    for (const auto &[words, status, suggestion] : cases)
-        test::IsRefused(words, suggestion, status);
+    test::CommandStory story({});
+    story.Run({
+        {"cnof", "get"},
+        {"conf", "gte"},
+        {"conf", "get", "--defautls", "x"},
+        {"conf", "get", "runsmaba"},
+        {"lock", "run", "tavoinof", "--", "true"},
+        {"error", "explain", "ERR_KEY_NOT_FUOND"},
+        {"error", "list", "--output", "nam"},
+    });
 }
 
 TEST(TavoctlFrame, ErrorCodesAreTheLibrarysOwn)
@@ -364,28 +341,21 @@ TEST(TavoctlFrame, VersionNamesMachineAndLibrary)
 
 TEST(TavoctlFrame, CompletionKnowsVerbsOptionsAndNames)
 {
-    const struct {
-        Words words;
-        const char *expected;
-    } cases[] = {
-        {{"er"}, "error\n"},
-        {{"conf", "co"}, "comment\n"},
-        {{"conf", "get", "--de"}, "--defaults\n"},
-        {{"conf", "get", "runsam"}, "runsamba\n"},
-        {{"conf", "get", "--file", "runsam"}, ""},
-        {{"conf", "get", "--file", "/etc/x", "runsam"}, "runsamba\n"},
-        {{"conf", "get", "runsamba", "run"}, ""},
-        {{"lock", "run", "--timeout", "5", "tavo"}, "tavoinfo\n"},
-        {{"error", "explain", "ERR_KEY_N"}, "ERR_KEY_NOT_FOUND\n"},
-        {{"proc", "signal", "/tmp/pid", "HU"}, "HUP\n"},
-        {{"version", "--j"}, "--json\n"},
-        {{"nonsense", "ge"}, ""},
-    };
-    for (const auto &[words, expected] : cases) {
-        Words line = {"--complete"};
-        line.insert(line.end(), words.begin(), words.end());
-        EXPECT_EQ(Tavoctl(line).out, expected) << testing::PrintToString(words);
-    }
+    test::CommandStory story({});
+    story.Run({
+        {"--complete", "er"},
+        {"--complete", "conf", "co"},
+        {"--complete", "conf", "get", "--de"},
+        {"--complete", "conf", "get", "runsam"},
+        {"--complete", "conf", "get", "--file", "runsam"},
+        {"--complete", "conf", "get", "--file", "/etc/x", "runsam"},
+        {"--complete", "conf", "get", "runsamba", "run"},
+        {"--complete", "lock", "run", "--timeout", "5", "tavo"},
+        {"--complete", "error", "explain", "ERR_KEY_N"},
+        {"--complete", "proc", "signal", "/tmp/pid", "HU"},
+        {"--complete", "version", "--j"},
+        {"--complete", "nonsense", "ge"},
+    });
 }
 
 }  // namespace
