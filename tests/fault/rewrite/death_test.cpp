@@ -130,15 +130,11 @@ TEST(Syncs, OneFileAndOneDirectoryHoweverManyKeys)
 {
     const test::ScratchDir dir;
     const std::string file = dir / "file";
-    test::PairMap twenty;
-    for (int i = 0; i < 20; ++i)
-        twenty["key" + std::to_string(i)] = "value";
-    const test::Hash pairs = test::MakeHash(twenty);
     test::WriteFile(file, kOldText);
     test::TakeSyncs();
     EXPECT_EQ(TLIBFileSetKeyValue(file.c_str(), "key", "new", nullptr), 1);
     const test::Syncs one = test::TakeSyncs();
-    EXPECT_EQ(TLIBFileSetKeys(file.c_str(), pairs.get(), nullptr), 1);
+    EXPECT_EQ(TLIBFileSetKeys(file.c_str(), test::NewPairs(), nullptr), 1);
     const test::Syncs many = test::TakeSyncs();
     EXPECT_EQ(one.files, 1);
     EXPECT_EQ(one.directories, 1);

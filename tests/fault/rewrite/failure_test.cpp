@@ -91,6 +91,9 @@ TEST(FailingCalls, OfAnAppendTakeItBack)
     EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, "file_append_key", 82}));
     EXPECT_EQ(TLIBFileAppendKey((dir / "made").c_str(), "added", "v", nullptr), -1);
     EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, "file_append_key", 66}));
+    test::FailCalls(Call::rename, EBUSY);
+    EXPECT_EQ(TLIBFileAppendKey((dir / "made").c_str(), "added", "v", nullptr), -1);
+    EXPECT_EQ(LastFault(), (Fault{ERR_RENAME_FAILED, "file_append_key"}));
     test::FailCalls(Call::none, 0);
     EXPECT_THAT(dir.Names(), ElementsAre("file"));
 }
