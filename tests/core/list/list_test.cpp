@@ -203,6 +203,20 @@ TEST(ListSets, OfAListWithItself)
     }
 }
 
+// A union that lacks one byte moves the list, once and before it adds anything.
+TEST(ListSets, GrowForTheLastByte)
+{
+    for (const size_t length : {483u, 484u}) {
+        List list = MakeList({});
+        const List other = MakeList({std::string(length, 'x')});
+        TLIBSZLIST *addr = list.release();
+        EXPECT_EQ(PslTLIBSzListOr(&addr, other.get(), 0), addr);
+        list.reset(addr);
+        EXPECT_EQ(list->nSize, length == 483 ? 512 : 1024);
+        EXPECT_EQ(Items(list.get()), Items(other.get()));
+    }
+}
+
 // A list that was only labelled as sorted may hold holes: they match nothing, not even a stored empty string.
 TEST(ListSets, HolesOfALabelledListMatchNothing)
 {
