@@ -50,22 +50,22 @@ class Partitions : public test::StorageStory {
 TEST_F(Partitions, EveryLayoutIsRecognisedAndNothingElse)
 {
     for (const TAVOPARTLAYOUT &layout : grgAllTavoPartLayout) {
-        const auto check = [&](const TAVOPARTPLACE &first, const TAVOPARTPLACE &second, int raid) {
+        TAVOPARTPLACE later = layout.place1, longer = layout.place1, after = layout.place2, shorter = layout.place2;
+        ++later.nStart, ++longer.cSector, ++after.nStart, --shorter.cSector;
+        const std::pair<TAVOPARTPLACE, TAVOPARTPLACE> tables[] = {{layout.place1, layout.place2},
+                                                                  {later, layout.place2},
+                                                                  {longer, layout.place2},
+                                                                  {layout.place1, after},
+                                                                  {layout.place1, shorter}};
+        story_.Head("version " + std::to_string(layout.nVersion) + (layout.fRaid ? " with RAID" : ""));
+        for (const auto &[first, second] : tables) {
             Show("sda", first, second);
             int version = -1;
-            const int found = BlTAVOCheckPartitionLayout("/dev/sda", raid, &version);
-            EXPECT_EQ(found == 1, version != -1);
-            return version;
-        };
-        const int raid = static_cast<int>(layout.fRaid);
-        EXPECT_EQ(check(layout.place1, layout.place2, raid), layout.nVersion);
-        EXPECT_EQ(check(layout.place1, layout.place2, 1 - raid), -1) << "the types differ";
-        TAVOPARTPLACE other = layout.place1;
-        other.nStart += 1;
-        EXPECT_EQ(check(other, layout.place2, raid), -1);
-        other = layout.place2;
-        other.cSector -= 1;
-        EXPECT_EQ(check(layout.place1, other, raid), -1);
+            TELL(BlTAVOCheckPartitionLayout("/dev/sda", static_cast<int>(layout.fRaid), &version));
+            story_.Show("version", version);
+        }
+        Show("sda", layout.place1, layout.place2);
+        TELL(BlTAVOCheckPartitionLayout("/dev/sda", 1 - static_cast<int>(layout.fRaid), nullptr));  // other types
     }
     // The RAID layout of version 1 has other sectors.
     Show("sda", {63, 273042, 0xFD}, {273105, 787185, 0xFD});
@@ -80,8 +80,8 @@ TEST_F(Partitions, ConfigsAreTheToolsAnswer)
     int64_t start = 0;
     uint32_t type = 0;
     TELL(RCPartitionConfigs(3, "/dev/sda", &start, &type));
-    EXPECT_EQ(start, 9437184);
-    EXPECT_EQ(type, 0xFDu);
+    story_.Show("start", start);
+    story_.Show("type", type);
     TELL(RCPartitionConfigs(3, "sda", nullptr, nullptr));
     start = 5;
     TELL(RCPartitionConfigs(0, "sda", &start, &type));

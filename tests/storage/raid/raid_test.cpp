@@ -290,13 +290,10 @@ TEST_F(Raid, Superblocks)
 {
     commands_.Print({{"/sbin/mdadm -E /dev/sda3 2>/dev/null", superblock_},
                      {"/sbin/mdadm -E /dev/sdb 2>/dev/null", "Name : nas:101\n"},
-                     {"/sbin/mdadm -E /dev/sdc 2>/dev/null", "Name : nas:100\n"},
-                     {"/sbin/mdadm -E /dev/sde 2>/dev/null", "Name : nas:7\nVersion : 1\nEvents : 5\n"},
-                     {"/sbin/mdadm -E /dev/sdf 2>/dev/null", "Name : nas:8\nDevice Role : Journal\nEvents : 5\n"},
-                     {"/sbin/mdadm -E /dev/sdg 2>/dev/null", "Name : nas:9\nthis is\nEvents : 5\n"}},
+                     {"/sbin/mdadm -E /dev/sdc 2>/dev/null", "Name : nas:100\n"}},
                     1);
     RAIDSUPERBLOCK superblock;
-    for (const char *path : {"/dev/sda3", "/dev/sdd", "/dev/sde", "/dev/sdf", "/dev/sdg"}) {
+    for (const char *path : {"/dev/sda3", "/dev/sdd"}) {
         TELL(RAIDSBGet(path, &superblock));
         story_.Show("array", superblock.szArray);
         story_.Show("events", superblock.nEvent);
@@ -312,6 +309,13 @@ TEST_F(Raid, Superblocks)
         int array = -9;
         TELL(RAIDDiskIsUsedByRAID(disk, &array));
         story_.Show("array", array);
+    }
+    for (const std::string bad :
+         {" Version : 1", " Version : 1.x", " Device Role : Journal", " Device Role : Active device x", "this is"}) {
+        commands_.Print({{"/sbin/mdadm -E /dev/sde 2>/dev/null", "Name : nas:7\n" + bad + "\nEvents : 5\n"}});
+        TELL(RAIDSBGet("/dev/sde", &superblock));
+        story_.Show("array", superblock.szArray);
+        story_.Show("events", superblock.nEvent);
     }
     commands_.Exit(-9);
     TELL(RAIDSBGet("/dev/sda3", &superblock));
