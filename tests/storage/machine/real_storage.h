@@ -111,27 +111,38 @@ inline std::vector<std::string> MembersOf(const std::string &path, int states)
 }
 
 struct Making {
-    std::string path;
-    int level;
-    std::vector<std::string> members;
     int slots = 0;  // 0: as many as members
     int spares = 0;
     uint64_t mib = 0;  // of each member
-    bool sync = true;
+    bool sync = false;
 };
 
-inline int Make(const Making &making)
+inline int Make(const std::string &path, int level, const std::vector<std::string> &paths, const Making &making = {})
 {
-    const List members = MakeList(making.members);
+    const List members = MakeList(paths);
     RAIDREQUEST request = {};
-    request.szPath = making.path.c_str();
-    request.fLevel = making.level;
+    request.szPath = path.c_str();
+    request.fLevel = level;
     request.nSpare = making.spares;
-    request.nSlot = making.slots ? making.slots : static_cast<int>(making.members.size()) - making.spares;
+    request.nSlot = making.slots ? making.slots : static_cast<int>(paths.size()) - making.spares;
     request.cbArray = making.mib << 20;
     request.pslMembers = members.get();
     request.fSync = making.sync ? 1 : 0;
     return RAIDCreate(&request);
+}
+
+// What can be read from a device again; the kernel keeps none of it.
+inline std::string SumOf(const std::string &device, int mib)
+{
+    return Told("echo 3 >/proc/sys/vm/drop_caches; timeout 60 head -c " + std::to_string(mib) + "M " + device +
+                " | md5sum");
+}
+
+// Fills the beginning of a device, and returns its sum.
+inline std::string Fill(const std::string &device, int mib)
+{
+    Told("dd if=/dev/urandom of=" + device + " bs=1M conv=fsync count=" + std::to_string(mib));
+    return SumOf(device, mib);
 }
 
 inline bool BecomesNormal(const std::string &path)
@@ -140,6 +151,11 @@ inline bool BecomesNormal(const std::string &path)
         const Array array = ReadArray(path);
         return array && array->nStatus == RAID_STATUS_NORMAL && !array->fRebuilding;
     });
+}
+
+inline std::string Disk(int bay)
+{
+    return std::string("/dev/sd") + static_cast<char>('a' + bay - 1);
 }
 
 // The disks in bays 1 to count, replaced by others of that size.
@@ -152,15 +168,25 @@ inline void PlugLargeDisks(int count, int mib)
     LiveOn(count);
 }
 
+inline void Partition(int bay)
+{
+    const std::string disk = Disk(bay);
+    ASSERT_EQ(PartitionCreate(disk.c_str(), PARTITION_SYSTEM, nullptr), 0) << disk;
+    ASSERT_EQ(PartitionCreate(disk.c_str(), PARTITION_DATA, nullptr), 0) << disk;
+}
+
+// The same with the partitions of the system and of data.
+inline void PlugSystemDisks(int count, int mib)
+{
+    PlugLargeDisks(count, mib);
+    for (int bay = 1; bay <= count; ++bay)
+        Partition(bay);
+}
+
 // As when the kernel finds that a member does not answer.
 inline void FailMember(const std::string &array, const std::string &member)
 {
     Told("echo faulty >/sys/block/" + array.substr(5) + "/md/dev-" + member.substr(5) + "/state");
-}
-
-inline std::string Disk(int bay)
-{
-    return std::string("/dev/sd") + static_cast<char>('a' + bay - 1);
 }
 
 inline void LiveOn(int count)
@@ -182,23 +208,12 @@ inline void LiveOn(int count)
             for (std::string &disk : disks)
                 disk += "3";
         }
-        ASSERT_EQ(Make({.path = "/dev/md2",
-                        .level = count > 2 ? RAID_LEVEL_5 : RAID_LEVEL_1,
-                        .members = disks,
-                        .slots = std::max(count, 2),
-                        .mib = 64,
-                        .sync = false}),
-                  0);
+        const int level = count > 2 ? RAID_LEVEL_5 : RAID_LEVEL_1;
+        ASSERT_EQ(Make("/dev/md2", level, disks, {.slots = std::max(count, 2), .mib = 64}), 0);
         Told("tavoctl volume create --yes 1 md2 && date >/volume1/old && tavoctl volume unmount 1 && "
              "rmdir /volume1 && tavoctl raid stop --yes md2");
     } else if (current_life == "superblocks") {
-        ASSERT_EQ(Make({.path = "/dev/md7",
-                        .level = RAID_LEVEL_1,
-                        .members = disks,
-                        .slots = std::max(count, 2),
-                        .mib = 32,
-                        .sync = false}),
-                  0);
+        ASSERT_EQ(Make("/dev/md7", RAID_LEVEL_1, disks, {.slots = std::max(count, 2), .mib = 32}), 0);
         ASSERT_EQ(RAIDStop("/dev/md7"), 0);
     } else if (current_life == "lvm") {
         // Another name than that of the group on smaller disks before, some of which may still be there.

@@ -74,12 +74,7 @@ TEST_F(MachineTimes, ReadingEightArraysIsCheaperThanMdadm)
     for (int i = 0; i < 8; ++i) {
         const std::string number = std::to_string(i);
         Told("truncate -s 8M /tmp/member" + number + "; losetup /dev/loop" + number + " /tmp/member" + number);
-        ASSERT_EQ(Make({.path = "/dev/md" + number,
-                        .level = RAID_LEVEL_1,
-                        .members = {"/dev/loop" + number},
-                        .slots = 2,
-                        .sync = false}),
-                  0);
+        ASSERT_EQ(Make("/dev/md" + number, RAID_LEVEL_1, {"/dev/loop" + number}, {.slots = 2}), 0);
     }
     const double library = LeastMicroseconds(20, [] {
         RAIDLIST *list = nullptr;

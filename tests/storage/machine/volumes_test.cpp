@@ -38,11 +38,8 @@ std::vector<std::string> PhysicalVolumes()
 
 TEST_P(MachineVolumes, AreMadeRenamedExpandedAndRemoved)
 {
-    ASSERT_EQ(
-        Make(
-            {.path = "/dev/md2", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .mib = 32, .sync = false}),
-        0);
-    ASSERT_EQ(Make({.path = "/dev/md3", .level = RAID_LEVEL_LINEAR, .members = {"/dev/sdc", "/dev/sdd"}}), 0);
+    ASSERT_EQ(Make("/dev/md2", RAID_LEVEL_1, {"/dev/sda", "/dev/sdb"}, {.mib = 32}), 0);
+    ASSERT_EQ(Make("/dev/md3", RAID_LEVEL_LINEAR, {"/dev/sdc", "/dev/sdd"}, {.sync = true}), 0);
     EXPECT_EQ(LVMPvSBGet("/dev/md2", nullptr), -1);
     LVMPV pv;
     EXPECT_EQ(LVMPvSBGet("/dev/md2", &pv), 0);
@@ -99,9 +96,8 @@ TEST_P(MachineVolumes, AreMadeRenamedExpandedAndRemoved)
 
 TEST_P(MachineVolumes, ADevicesVolumeGoesWithItsMountedSnapshots)
 {
-    ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .sync = false}), 0);
-    ASSERT_EQ(Make({.path = "/dev/md22", .level = RAID_LEVEL_1, .members = {"/dev/sdc", "/dev/sdd"}, .sync = false}),
-              0);
+    ASSERT_EQ(Make("/dev/md2", RAID_LEVEL_1, {"/dev/sda", "/dev/sdb"}), 0);
+    ASSERT_EQ(Make("/dev/md22", RAID_LEVEL_1, {"/dev/sdc", "/dev/sdd"}), 0);
     // The library makes neither snapshots nor volumes that leave room for them.
     for (const auto &[array, group] : {std::pair("/dev/md2", "/dev/vg1"), std::pair("/dev/md22", "/dev/vg2")}) {
         ASSERT_EQ(LVMPvCreate(array), 0);
@@ -122,7 +118,7 @@ TEST_P(MachineVolumes, ADevicesVolumeGoesWithItsMountedSnapshots)
 
 TEST_P(MachineVolumes, StrayPhysicalVolumesAreCleanedAndArraysAreNot)
 {
-    ASSERT_EQ(Make({.path = "/dev/md2", .level = RAID_LEVEL_1, .members = {"/dev/sda", "/dev/sdb"}, .sync = false}), 0);
+    ASSERT_EQ(Make("/dev/md2", RAID_LEVEL_1, {"/dev/sda", "/dev/sdb"}), 0);
     ASSERT_EQ(LVMCreate(test::MakeList({"/dev/md2"}).get(), "/dev/vg1", "lv", nullptr, 0), 0);
     ASSERT_EQ(LVMPvCreate("/dev/sdc"), 0);
     ASSERT_EQ(LVMCreate(test::MakeList({"/dev/sdd"}).get(), "/dev/vg7", "lv", nullptr, 0), 0);
