@@ -310,6 +310,12 @@ TEST_F(Raid, Superblocks)
         TELL(RAIDDiskIsUsedByRAID(disk, &array));
         story_.Show("array", array);
     }
+    calls_.OnIoctl(Put());
+    for (const int size : {64, 36, 35, 1}) {
+        char uuid[64] = "?";
+        TELL(RAIDUUIDGet("/dev/md5", uuid, size));
+        story_.Show("UUID", uuid);
+    }
     for (const std::string bad :
          {" Version : 1", " Version : 1.x", " Device Role : Journal", " Device Role : Active device x", "this is"}) {
         commands_.Print({{"/sbin/mdadm -E /dev/sde 2>/dev/null", "Name : nas:7\n" + bad + "\nEvents : 5\n"}});
@@ -642,13 +648,13 @@ class RaidReplace : public Raid {
         });
     }
 
-    // These disks alone have partitions.
-    void LayOut(const std::string &disks)
+    // These disks alone have partitions, the others of an older version.
+    void LayOut(const std::string &disks, const std::string &others = "")
     {
         outputs_.clear();
-        const TAVOPARTLAYOUT &layout = grgAllTavoPartLayout[9];
-        const TAVOPARTPLACE places[] = {layout.place1, layout.place2, {9437184, 5000000, 0xFD}};
-        for (const char disk : disks) {
+        for (const char disk : disks + others) {
+            const TAVOPARTLAYOUT &layout = grgAllTavoPartLayout[others.find(disk) == others.npos ? 9 : 8];
+            const TAVOPARTPLACE places[] = {layout.place1, layout.place2, {9437184, 5000000, 0xFD}};
             for (const int i : {0, 1, 2})
                 outputs_["/sbin/sfdisk -l -uS -N" + std::to_string(i + 1) + " /dev/sd" + disk] =
                     "/dev/x " + std::to_string(places[i].nStart) + " 0 " + std::to_string(places[i].cSector) +
@@ -671,6 +677,26 @@ TEST_F(RaidReplace, PartitionsAndAddsTheNewDisk)
     members_[1] = members_[2];
     LayOut("acd");
     outputs_["/sbin/mdadm -E /dev/sdd3 2>/dev/null"] = superblock_;
+    TELL(RAIDReplaceDisk(&info_, nullptr, "/dev/sdd"));
+    LayOut("ac", "d");
+    TELL(RAIDReplaceDisk(&info_, nullptr, "/dev/sdd"));
+    // Disks of more than 2^32 sectors end with a copy of their table.
+    LayOut("ac");
+    for (const uint64_t beyond : {0, 1}) {
+        for (const uint64_t more : {0, 1}) {
+            const uint64_t sectors = (uint64_t{1} << 32) + beyond;
+            Size(sectors * 512);
+            info_.cbMember = (sectors - 9437184 - 33 * beyond - 2048 + more) * 512;
+            TELL(RAIDReplaceDisk(&info_, nullptr, "/dev/sdd"));
+        }
+    }
+    // An array of the first partitions.
+    for (RAIDMEMBER &member : members_)
+        *std::strchr(member.szPath, '3') = '1';
+    PutNodes({"sda1", "sdc1", "sdd1"});
+    info_.cbMember = uint64_t{4000000} * 512;
+    TELL(RAIDReplaceDisk(&info_, nullptr, "/dev/sdd"));
+    info_.cbMember = uint64_t{4980480 - 1} * 512;
     TELL(RAIDReplaceDisk(&info_, nullptr, "/dev/sdd"));
 }
 

@@ -29,6 +29,7 @@ namespace {
 using test::MakeList;
 
 constexpr uint64_t kTib = uint64_t{1} << 40;
+const RAIDINFO raid5 = {2, "/dev/md2", RAID_LEVEL_5, 1, 0, 8 * kTib, 4 * kTib, 3, 3, 0, nullptr};
 
 class Reach : public test::StorageScene {
   protected:
@@ -76,7 +77,6 @@ class Reach : public test::StorageScene {
 TEST_F(Reach, NothingBeyondItIsMade)
 {
     const RAIDINFO linear = {2, "/dev/md2", RAID_LEVEL_LINEAR, 1, 0, 8 * kTib, 0, 2, 2, 0, nullptr};
-    const RAIDINFO raid5 = {2, "/dev/md2", RAID_LEVEL_5, 1, 0, 8 * kTib, 4 * kTib, 3, 3, 0, nullptr};
     const int version = 7;
     const auto group = MakeList({"/dev/md2", "/dev/md3"});
     LVMVGINFO *const info = LVMVgInfoAlloc();
@@ -105,7 +105,7 @@ TEST_F(Reach, NothingBeyondItIsMade)
         {[] { return Create(RAID_LEVEL_6, 2, 4); }, 8 * kTib, "RAID 6"},
         {[] { return Create(RAID_LEVEL_10, 2, 4); }, 8 * kTib, "RAID 10"},
         {[&] { return RAIDAdd(&linear, "/dev/sdb3"); }, 8 * kTib, "longer"},
-        {[&] { return RAIDAdd(&raid5, "/dev/sdd3"); }, 16 * kTib, "a member"},
+        {[] { return RAIDAdd(&raid5, "/dev/sdd3"); }, 16 * kTib, "a member"},
         {[] { return LVMPvCreate("/dev/md2"); }, 16 * kTib, "volume"},
         {[&] { return LVMVgCreate("/dev/vg1", group.get()); }, 8 * kTib, "group"},
         {[&] { return LVMCreate(group.get(), "/dev/vg1", "lv", nullptr, 0); }, 8 * kTib, "all of it"},
@@ -133,16 +133,15 @@ TEST_F(Reach, NoArrayGrowsBeyondIt)
 {
     machine_answer = "armv7l";
     device_bytes_ = 4 * kTib;
-    const RAIDINFO raid5 = {2, "/dev/md2", RAID_LEVEL_5, 1, 0, 8 * kTib, 4 * kTib, 3, 3, 0, nullptr};
-    EXPECT_FALSE(IsRefused([&] { return RAIDDevCountChange(&raid5, 5); }));
-    EXPECT_TRUE(IsRefused([&] { return RAIDDevCountChange(&raid5, 6); }));
+    EXPECT_FALSE(IsRefused([] { return RAIDDevCountChange(&raid5, 5); }));
+    EXPECT_TRUE(IsRefused([] { return RAIDDevCountChange(&raid5, 6); }));
     const RAIDINFO raid1 = {2, "/dev/md2", RAID_LEVEL_1, 1, 0, 8 * kTib, 8 * kTib, 2, 2, 0, nullptr};
     EXPECT_FALSE(IsRefused([&] { return RAIDDevCountChange(&raid1, 9); }));
-    EXPECT_FALSE(IsRefused([&] { return RAIDDevCountChange(&raid5, 1); })) << "mdadm's to refuse";
+    EXPECT_FALSE(IsRefused([] { return RAIDDevCountChange(&raid5, 1); })) << "mdadm's to refuse";
     // The level cannot be changed back, so the size is looked at before it.
     const test::List eight = MakeList(std::vector<std::string>(8, "/dev/sdd3"));
     EXPECT_TRUE(IsRefused([&] { return RAIDMigrate2RAID6(&raid5, eight.get()); }));
-    EXPECT_FALSE(IsRefused([&] { return RAIDMigrate2RAID6(&raid5, MakeList({"/dev/sdd3"}).get()); }));
+    EXPECT_FALSE(IsRefused([] { return RAIDMigrate2RAID6(&raid5, MakeList({"/dev/sdd3"}).get()); }));
 }
 
 }  // namespace
