@@ -15,7 +15,6 @@
 #include <sys/prctl.h>
 
 using test::LinkTarget;
-using test::ScriptCalls;
 using test::Services;
 using test::WriteFile;
 using testing::ElementsAre;
