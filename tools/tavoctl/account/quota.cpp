@@ -14,7 +14,6 @@ namespace tavoctl {
 namespace {
 
 constexpr char volume_help[] = "number of the volume: 1 for /volume1";
-constexpr int64_t most_volumes = 9999;
 
 // Megabytes of "1536K", "1.5M", "2G", "1T" or a number alone; "none" takes the limit away.
 std::optional<double> LimitOf(const std::string &text)

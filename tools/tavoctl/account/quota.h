@@ -13,6 +13,7 @@
 namespace tavoctl {
 
 inline constexpr double kib_in_mb = 1024;
+inline constexpr int64_t most_volumes = 9999;
 
 struct UserQuota {
     std::string user;

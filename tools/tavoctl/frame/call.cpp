@@ -44,6 +44,11 @@ bool Call::IsWanted(const ColumnFacts &column) const
     return column.place != in_one || Contains(style.columns, column.name);
 }
 
+void Call::Print(const Failure &failure) const
+{
+    std::cerr << (json ? failure.Json() : failure.Text(verbose)) + "\n";
+}
+
 void Call::Change(const std::string &object, const std::string &column, const Cell &before, const Cell &after)
 {
     if (!(before == after))
@@ -66,7 +71,7 @@ void Call::FailEntry(const std::string &object, const Failure &failure)
             }
         }
     std::erase_if(report.changes, [&](const tavoctl::Change &change) { return change.object == object; });
-    std::cerr << (json ? failure.Json() : failure.Text(verbose)) + "\n";
+    Print(failure);
     if (status == exit_done)
         status = failure.Status();
 }

@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <cstdint>
 #include <cstdlib>
 #include <fstream>
 #include <iostream>
@@ -32,6 +33,11 @@ bool WriteAll(int fd, const std::string &text)
     return true;
 }
 
+void RefuseLarge(const std::string &attempted, uint64_t size)
+{
+    RefuseIf(size > most_input, attempted, "larger than 16 MiB", "split it");
+}
+
 }  // namespace
 
 Descriptor::~Descriptor()
@@ -46,7 +52,7 @@ void RefuseNoText(const std::string &path)
     if (::stat(path.c_str(), &state) != 0)
         return;
     RefuseIf(!S_ISREG(state.st_mode), "read " + path, "not a regular file");
-    RefuseIf(state.st_size > static_cast<off_t>(most_input), "read " + path, "larger than 16 MiB", "split it");
+    RefuseLarge("read " + path, static_cast<uint64_t>(state.st_size));
 }
 
 std::string ReadWhole(const std::string &path)
@@ -60,9 +66,7 @@ std::string ReadWhole(const std::string &path)
         throw SystemFailure(attempted, errno);
     RefuseIf(!S_ISREG(state.st_mode) && !(piped && (S_ISFIFO(state.st_mode) || S_ISSOCK(state.st_mode))), attempted,
              "not a regular file", "send other input through a pipe, as -");
-    const auto refuse = [&] { throw UsageFailure(attempted, "larger than 16 MiB", "split it"); };
-    if (state.st_size > static_cast<off_t>(most_input))
-        refuse();
+    RefuseLarge(attempted, static_cast<uint64_t>(state.st_size));
     std::string text;
     char bytes[65536];
     for (;;) {
@@ -74,8 +78,7 @@ std::string ReadWhole(const std::string &path)
         if (count == 0)
             return text;
         text.append(bytes, static_cast<std::size_t>(count));
-        if (text.size() > most_input)
-            refuse();
+        RefuseLarge(attempted, text.size());
     }
 }
 

@@ -32,7 +32,7 @@ int Report(const Failure &failure, const Call &call)
 {
     const Failure known = WithPermissions(failure);
     std::cout.flush();
-    std::cerr << (call.json ? known.Json() : known.Text(call.verbose)) << "\n";
+    call.Print(known);
     return known.Status();
 }
 

@@ -135,6 +135,9 @@ struct Call {
     void BeginEntry(const std::string &object);
     void FailEntry(const std::string &object, const Failure &failure);
 
+    // To standard error: as text, or as JSON with --json.
+    void Print(const Failure &failure) const;
+
     // Records a chosen value, such as an id; a field of the JSON beside "changed".
     void Tell(const std::string &name, const Cell &value) { report.chosen.emplace_back(name, value); }
 

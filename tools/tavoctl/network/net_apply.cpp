@@ -201,10 +201,7 @@ void CarryOut(const NetPlan &plan, bool probe, const std::optional<int64_t> &tri
 
 Action NetExport(Arguments &)
 {
-    return [](Call &) {
-        const NetDocument document = StoredNet();
-        std::cout << JsonOf(document) << "\n";
-    };
+    return [](Call &) { std::cout << JsonOf(StoredNet()) << "\n"; };
 }
 
 Action NetApply(Arguments &in)

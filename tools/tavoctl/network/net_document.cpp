@@ -15,9 +15,9 @@ using Json = nlohmann::ordered_json;
 
 constexpr char ipv4_network_pattern[] = R"(^[0-9]{1,3}(\.[0-9]{1,3}){3}/[0-9]{1,2}$)";
 constexpr char ipv4_pattern[] = R"(^[0-9]{1,3}(\.[0-9]{1,3}){3}$)";
-constexpr char ipv6_pattern[] = "^[0-9A-Fa-f:.]+$";
+constexpr char ipv6_pattern[] = "^[0-9A-Fa-f:.]+$";  // matches IPv4 addresses, too
 constexpr char ipv6_network_pattern[] = "^[0-9A-Fa-f:.]+/[0-9]{1,3}$";
-constexpr char any_address_pattern[] = "^[0-9A-Fa-f:.]+$";
+constexpr char ipv4_card_allowed[] = "the IPv4 address of a host with the length of its network, 192.0.2.10/24";
 constexpr char route_pattern[] = "^[0-9A-Fa-f:.]+/[0-9]{1,3}( via [0-9A-Fa-f:.]+)?$";
 constexpr char interface_pattern[] = "^[A-Za-z0-9_.:-]{1,15}$";
 
@@ -28,7 +28,7 @@ const std::vector<NetItem> net_items = {
      "1 to 15 letters, digits, \"-\" and \"_\", with a letter first"},
     {"gateway", NetItem::text, true, "", ipv4_pattern, "the IPv4 router, while the first card has a static address",
      NormalIpv4, "the IPv4 address of a host"},
-    {"dns", NetItem::texts, false, "", any_address_pattern, "the name servers, in the order in which they are asked",
+    {"dns", NetItem::texts, false, "", ipv6_pattern, "the name servers, in the order in which they are asked",
      NormalServer, "the IPv4 or IPv6 address of a host"},
     {"search", NetItem::texts, false, "search", "^[A-Za-z0-9.-]{1,255}$", "domains in which a short name is looked up",
      NormalDomain, "the name of a domain"},
@@ -45,9 +45,9 @@ const std::vector<NetItem> card_items = {
     {"mode", NetItem::text, false, "", "^(dhcp|static|none)$", "where the address comes from", NormalCardMode,
      "dhcp, static or none"},
     {"address", NetItem::text, true, "", ipv4_network_pattern, "of a static card, with the length of its mask",
-     NormalIpv4Card, "the IPv4 address of a host with the length of its network, 192.0.2.10/24"},
+     NormalIpv4Card, ipv4_card_allowed},
     {"more_addresses", NetItem::texts, false, "addresses", ipv4_network_pattern, "further IPv4 addresses",
-     NormalIpv4Card, "the IPv4 address of a host with the length of its network, 192.0.2.10/24"},
+     NormalIpv4Card, ipv4_card_allowed},
     {"ipv6", NetItem::truth, false, "", "", "whether the card speaks IPv6", nullptr},
     {"ipv6_addresses", NetItem::texts, false, "", ipv6_network_pattern, "static ones", NormalIpv6Card,
      "the IPv6 address of a host with the length of its network, 2001:db8::10/64"},
@@ -96,9 +96,9 @@ Cell Texts(const NetItem &item, const Json &value, const std::string &place)
             RefuseDocument(here, "duplicate " + texts.back());
     }
     // Only for name servers and search domains the order means something.
-    if (item.feature[0] || std::string(item.name) == "ipv6_addresses")
-        if (std::string(item.name) != "search")
-            std::sort(texts.begin(), texts.end());
+    const std::string name = item.name;
+    if (name != "dns" && name != "search")
+        std::sort(texts.begin(), texts.end());
     return texts;
 }
 

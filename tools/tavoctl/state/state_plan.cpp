@@ -19,7 +19,6 @@
 
 #include <climits>
 #include <cmath>
-#include <iostream>
 
 namespace tavoctl {
 namespace {
@@ -137,7 +136,8 @@ void StatePlan::AddItem(Call &call, Item item)
 void StatePlan::PlanQuota(Call &call, const StateJson &row, const std::string &place)
 {
     CheckFields(row, {"volume", "user", "limit_kib"}, place);
-    if (!row.contains("volume") || !row["volume"].is_number_unsigned() || row["volume"] < 1 || row["volume"] > 9999)
+    if (!row.contains("volume") || !row["volume"].is_number_unsigned() || row["volume"] < 1 ||
+        row["volume"] > most_volumes)
         RefuseDocument(place + ".volume", "not the number of a volume");
     if (!row.contains("limit_kib") || !(row["limit_kib"].is_null() || row["limit_kib"].is_number_unsigned()) ||
         row["limit_kib"] > most_kib)
@@ -299,7 +299,7 @@ bool StatePlan::WarnOfRefused(Call &call) const
     bool any = false;
     for (const Item &item : items_)
         if (item.refused) {
-            std::cerr << (call.json ? item.refused->Json() : item.refused->Text(call.verbose)) + "\n";
+            call.Print(*item.refused);
             call.status = any ? call.status : item.refused->Status();
             any = true;
         }
