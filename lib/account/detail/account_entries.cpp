@@ -21,8 +21,11 @@ void AccountEntries::AddAccount(const std::string &key, const std::string &name,
         highest_ = std::max(highest_, id);
 }
 
-void AccountEntries::AddLine(size_t store, std::string_view name, std::string_view line)
+void AccountEntries::AddLine(size_t store, std::string_view line)
 {
+    const std::string_view name = line.substr(0, line.find(':'));
+    if (name.empty() || name.size() == line.size() || HasNul(line))
+        return;
     const auto exact = keys_.find(name);
     std::string key = exact != keys_.end() ? exact->second : AccountKey(name, kind_.key_size).value_or(std::string());
     if (stores_[kind_.name_store].contains(key))

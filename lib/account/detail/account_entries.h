@@ -21,8 +21,8 @@ class AccountEntries {
     // by it.
     void AddAccount(const std::string &key, const std::string &name, int32_t id, std::string_view line);
 
-    // Stores what another file says about an account. The first line wins; one without an account is dropped.
-    void AddLine(size_t store, std::string_view name, std::string_view line);
+    // Stores a line of another file, "NAME:...". The first of an account wins; one without an account is dropped.
+    void AddLine(size_t store, std::string_view line);
 
     // The id assigned last is the recorded one, otherwise the highest that an account has.
     void SetLastId(std::optional<int32_t> recorded);

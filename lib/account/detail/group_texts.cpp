@@ -27,13 +27,6 @@ void AddGroup(AccountEntries &entries, std::string_view line)
     entries.AddAccount(*key, group->name, group->gid, line);
 }
 
-void AddDescription(AccountEntries &entries, std::string_view line)
-{
-    const std::string_view name = line.substr(0, line.find(':'));
-    if (!name.empty() && name.size() < line.size() && !HasNul(line))
-        entries.AddLine(kDescStore, name, line);
-}
-
 }  // namespace
 
 std::vector<StoreEntries> GroupStoreEntries(std::string_view groups, std::string_view descriptions)
@@ -48,7 +41,7 @@ std::vector<StoreEntries> GroupStoreEntries(std::string_view groups, std::string
             AddGroup(entries, line);
     }
     while (!descriptions.empty())
-        AddDescription(entries, TakeLine(descriptions));
+        entries.AddLine(kDescStore, TakeLine(descriptions));
     entries.SetLastId(last_gid);
     return entries.Take();
 }

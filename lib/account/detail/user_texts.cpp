@@ -35,13 +35,6 @@ void AddPasswd(AccountEntries &entries, std::string_view line, std::map<std::str
         passwords.emplace(account->name, password);
 }
 
-void AddUserLine(AccountEntries &entries, UserStoreIndex store, std::string_view line)
-{
-    const std::string_view name = line.substr(0, line.find(':'));
-    if (!name.empty() && !line.starts_with('#') && !HasNul(line))
-        entries.AddLine(store, name, line);
-}
-
 }  // namespace
 
 std::vector<StoreEntries> UserStoreEntries(const UserTexts &texts)
@@ -51,18 +44,18 @@ std::vector<StoreEntries> UserStoreEntries(const UserTexts &texts)
     for (std::string_view rest = texts.passwd; !rest.empty();)
         AddPasswd(entries, TakeLine(rest), passwords);
     for (std::string_view rest = texts.shadow; !rest.empty();)
-        AddUserLine(entries, kShadowStore, TakeLine(rest));
+        entries.AddLine(kShadowStore, TakeLine(rest));
     for (const auto &[name, password] : passwords)
-        entries.AddLine(kShadowStore, name, FormatShadowLine({name, password}, ::time(nullptr)));
+        entries.AddLine(kShadowStore, FormatShadowLine({name, password}, ::time(nullptr)));
     for (std::string_view rest = texts.smb; !rest.empty();)
-        AddUserLine(entries, kSmbStore, TakeLine(rest));
+        entries.AddLine(kSmbStore, TakeLine(rest));
     std::optional<int32_t> last_uid;
     for (std::string_view rest = texts.misc; !rest.empty();) {
         const std::string_view line = TakeLine(rest);
         if (const std::optional<int32_t> id = ParseMarkerLine(line, kUidMarker))
             last_uid = id;
         else
-            AddUserLine(entries, kMiscStore, line);
+            entries.AddLine(kMiscStore, line);
     }
     entries.SetLastId(last_uid);
     return entries.Take();

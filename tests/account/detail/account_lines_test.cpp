@@ -169,7 +169,7 @@ TEST(UserTexts, ForeignFilesKeepTheirAccounts)
                                           "old:$1$ab$hash:1033:100::/home/old:/bin/sh\n"
                                           "+::::::\nno account\n\n# comment:x:1:1:::\n"
                                           "last:x:4294967294:65534::/:/bin/false",
-                                .shadow = "root:*:1:0:99999:7:::\nbob:B:1:0:99999:7:::\nBob:b:1:0:99999:7:::\n"
+                                .shadow = "root:*:1:0:99999:7:::\nbob\nbob:B:1:0:99999:7:::\nBob:b:1:0:99999:7:::\n"
                                           "ghost:*:1:0:99999:7:::\nroot:second:1:0:99999:7:::\n",
                                 .misc = "#$_@UID__INDEX@_$2000$\n# record user misc\nBOB:3:mail\n",
                                 .smb = "# samba\nbob:1031:X:Y:[U          ]:LCT-00000000:\n"});
@@ -182,7 +182,7 @@ TEST(UserTexts, ForeignFilesKeepTheirAccounts)
 
     const auto &shadow = stores[tavo::kShadowStore];
     EXPECT_EQ(Value(shadow, "BOB"), "Bob:b:1:0:99999:7:::\0"s);
-    EXPECT_EQ(Value(shadow, "bob"), "bob:B:1:0:99999:7:::\0"s);
+    EXPECT_EQ(Value(shadow, "bob"), "bob:B:1:0:99999:7:::\0"s) << "a line without fields hides no other";
     EXPECT_EQ(Value(shadow, "ROOT"), "root:*:1:0:99999:7:::\0"s) << "the first line is what the system reads";
     EXPECT_TRUE(Value(shadow, "OLD").starts_with("old:$1$ab$hash:")) << "the password is no longer in passwd";
     EXPECT_EQ(Value(shadow, "GHOST"), "(none)");

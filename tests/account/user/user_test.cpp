@@ -447,7 +447,7 @@ TEST(UserFollowUp, LocksAreFreeWhileAHomeIsRemoved)
 }
 
 // A process of the test's is the daemon; where none runs, no tool is started.
-TEST(UserFollowUp, CachesOfTheSystemsLookUpsAreFlushed)
+TEST(UserFollowUp, CachesAreFlushedAndConnectionsEnded)
 {
     const auto start = [](const char *pid_file) {
         std::filesystem::create_directories(std::filesystem::path(pid_file).parent_path());
@@ -471,6 +471,15 @@ TEST(UserFollowUp, CachesOfTheSystemsLookUpsAreFlushed)
     std::filesystem::remove("/var/run/nscd/nscd.pid");
     start("/var/run/sssd.pid");
     test::Scenario scenario;
+    scenario.Expect({"/usr/bin/smbstatus", "-b", "-u", "alice"})
+        .Prints("PID     Username      Group         Machine\n"
+                "1234    alice         users         desk (192.0.2.5)\n"
+                "1235    alicea        users         desk (192.0.2.5)\n"
+                "12x4    alice         users         desk (192.0.2.5)\n"
+                "1236\n"
+                "1237    alice         users         lap (192.0.2.6)\n");
+    scenario.Expect({"/usr/bin/smbcontrol", "1234", "shutdown"}).Exits(1);
+    scenario.Expect({"/usr/bin/smbcontrol", "1237", "shutdown"});
     scenario.Expect({"/usr/sbin/sss_cache", "-U", "-G"});
     EXPECT_EQ(test::DeleteUser("alice"), 0);
 }
