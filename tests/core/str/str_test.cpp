@@ -1,6 +1,7 @@
 // Tokens, trimming, colon encoding, and UTF-8 without regard to case.
 #include "tavo_str.h"
 
+#include "support/story.h"
 #include "support/test.h"
 
 #include <climits>
@@ -24,23 +25,15 @@ Texts Tokens(char *(*cut)(char **, const char *), std::string text, const char *
 
 TEST(StrTok, SkipsEmptyTokensWhereSepReturnsThem)
 {
+    test::Story story_{TEST_GOLDEN, {}};
     const struct {
-        const char *text;
-        const char *delimiters;
-        Texts tokens;
-        Texts separated;
-    } rows[] = {
-        {"a=b", "=", {"a", "b"}, {"a", "b"}},
-        {"==a==b=", "=", {"a", "b"}, {"", "", "a", "", "b", ""}},
-        {"a, b;c", ",;", {"a", " b", "c"}, {"a", " b", "c"}},
-        {"", "=", {}, {""}},
-        {"::", ":", {}, {"", "", ""}},
-        {"no delimiter", "", {"no delimiter"}, {"no delimiter"}},
-    };
+        const char *text, *delimiters;
+    } rows[] = {{"a=b", "="}, {"==a==b=", "="}, {"a, b;c", ",;"}, {"", "="}, {"::", ":"}, {"no delimiter", ""}};
     for (const auto &row : rows) {
-        EXPECT_EQ(Tokens(TLIBStrTok, row.text, row.delimiters), row.tokens) << row.text;
-        EXPECT_EQ(Tokens(TLIBIStrTok, row.text, row.delimiters), row.tokens) << row.text;
-        EXPECT_EQ(Tokens(TLIBStrSep, row.text, row.delimiters), row.separated) << row.text;
+        const Texts tokens = Tokens(TLIBStrTok, row.text, row.delimiters);
+        story_.Show(row.text, tokens);
+        EXPECT_EQ(Tokens(TLIBIStrTok, row.text, row.delimiters), tokens) << row.text;
+        story_.Show("separated", Tokens(TLIBStrSep, row.text, row.delimiters));
     }
     char text[] = "=x";
     char *cursor = text;
@@ -56,39 +49,22 @@ TEST(StrTok, SkipsEmptyTokensWhereSepReturnsThem)
 
 TEST(StrTrimSpace, WhiteSpaceThenOnePairOfQuotes)
 {
-    const struct {
-        const char *text;
-        const char *trimmed;
-    } rows[] = {
-        {" \t\r\nabc\n", "abc"},
-        {"", ""},
-        {" \n\t ", ""},
-        {"\"a b\"", "a b"},
-        {" \" a \" ", " a "},
-        {"\"", "\""},
-        {"\"\"", ""},
-        {"\"a", "\"a"},
-        {"a\"", "a\""},
-        {"\"\"a\"\"", "\"a\""},
-        {"\va\f", "\va\f"},
-        {"a b", "a b"},
-        {"  \"\"\"  ", "\""},
-        {"'a'", "'a'"},
-    };
-    for (const auto &row : rows) {
-        const int length = static_cast<int>(std::strlen(row.trimmed));
-        for (const bool with_target : {false, true}) {
-            std::string source = row.text;
-            EXPECT_EQ(TLIBStrTrimSpace(source.data(), with_target ? source.data() : nullptr), length);
-            EXPECT_STREQ(source.c_str(), row.trimmed);
-        }
-        std::string source = row.text;
+    test::Story story_{TEST_GOLDEN, {}};
+    for (const char *text : {" \t\r\nabc\n", "", " \n\t ", "\"a b\"", " \" a \" ", "\"", "\"\"", "\"a", "a\"",
+                             "\"\"a\"\"", "\va\f", "a b", "  \"\"\"  ", "'a'"}) {
+        std::string source = text;
         char target[16];
         std::memset(target, '#', sizeof target);
-        EXPECT_EQ(TLIBStrTrimSpace(source.data(), target), length);
-        EXPECT_STREQ(target, row.trimmed);
+        const int length = TLIBStrTrimSpace(source.data(), target);
+        story_.Show(text, target);
+        EXPECT_EQ(length, static_cast<int>(std::strlen(target))) << text;
         EXPECT_EQ(target[length + 1], '#');
-        EXPECT_EQ(source, row.text);
+        EXPECT_EQ(source, text);
+        for (const bool with_target : {false, true}) {
+            source = text;
+            EXPECT_EQ(TLIBStrTrimSpace(source.data(), with_target ? source.data() : nullptr), length);
+            EXPECT_STREQ(source.c_str(), target);
+        }
     }
 }
 
@@ -111,33 +87,17 @@ TEST(StrTrimSpace, RefusesOverlap)
 
 TEST(StrColon, EncodesWhatAFieldCannotHold)
 {
-    const struct {
-        const char *text;
-        const char *encoded;
-    } rows[] = {
-        {"", ""},
-        {"Tom's NAS (50% full)", "Tom's NAS (50% full)"},
-        {"a:b::", "a%3Ab%3A%3A"},
-        {"two\nlines\r", "two%0Alines%0D"},
-        {"%3A", "%253A"},
-        {"%25", "%2525"},
-        {"%", "%"},
-        {"%2", "%2"},
-        {"%%3A", "%%253A"},
-        {"%:", "%%3A"},
-        {"%2:", "%2%3A"},
-        {"%3a", "%3a"},
-        {"Zo\xc3\xab \xff", "Zo\xc3\xab \xff"},
-    };
-    for (const auto &row : rows) {
+    test::Story story_{TEST_GOLDEN, {}};
+    for (const char *text : {"", "Tom's NAS (50% full)", "a:b::", "two\nlines\r", "%3A", "%25", "%", "%2", "%%3A",
+                             "%:", "%2:", "%3a", "Zo\xc3\xab \xff"}) {
         char buffer[64];
-        const int length = static_cast<int>(std::strlen(row.encoded)) + 1;
-        EXPECT_EQ(TLIBStrEncodeColon(row.text, nullptr, 0), length);
-        EXPECT_EQ(TLIBStrEncodeColon(row.text, buffer, length), length);
-        EXPECT_STREQ(buffer, row.encoded);
-        EXPECT_EQ(TLIBStrDecodeColon(buffer, nullptr, 0), static_cast<int>(std::strlen(row.text)) + 1);
-        EXPECT_EQ(TLIBStrDecodeColon(buffer, buffer, sizeof buffer), static_cast<int>(std::strlen(row.text)) + 1);
-        EXPECT_STREQ(buffer, row.text);
+        const int length = TLIBStrEncodeColon(text, nullptr, 0);
+        EXPECT_EQ(TLIBStrEncodeColon(text, buffer, length), length);
+        EXPECT_EQ(length, static_cast<int>(std::strlen(buffer)) + 1) << text;
+        story_.Show(text, buffer);
+        EXPECT_EQ(TLIBStrDecodeColon(buffer, nullptr, 0), static_cast<int>(std::strlen(text)) + 1);
+        EXPECT_EQ(TLIBStrDecodeColon(buffer, buffer, sizeof buffer), static_cast<int>(std::strlen(text)) + 1);
+        EXPECT_STREQ(buffer, text);
     }
 }
 
@@ -181,35 +141,20 @@ TEST(StrColon, RefusesAndWritesNothing)
 
 TEST(Utf8Upper, FollowsTheUnicodeTables)
 {
-    const struct {
-        const char *text;
-        const char *upper;
-    } rows[] = {
-        {"", ""},
-        {"admin", "ADMIN"},
-        {"Ünïcode", "ÜNÏCODE"},
-        {"straße", "STRASSE"},
-        {"ﬃ", "FFI"},
-        {"ıi", "II"},
-        {"λόγος", "ΛΌΓΟΣ"},
-        {"ŉ", "ʼN"},
-        {"用户1", "用户1"},
-        {"𐐨", "𐐀"},
-        {"_-. $", "_-. $"},
-        {"ΐΐΐΐΐΐΐ", "\u0399\u0308\u0301\u0399\u0308\u0301\u0399\u0308\u0301\u0399\u0308\u0301"
-                    "\u0399\u0308\u0301\u0399\u0308\u0301\u0399\u0308\u0301"},
-    };
-    for (const auto &row : rows) {
+    test::Story story_{TEST_GOLDEN, {}};
+    for (const char *text :
+         {"", "admin", "Ünïcode", "straße", "ﬃ", "ıi", "λόγος", "ŉ", "用户1", "𐐨", "_-. $", "ΐΐΐΐΐΐΐ"}) {
         char buffer[128];
-        std::strcpy(buffer, row.text);
-        const int length = static_cast<int>(std::strlen(row.upper)) + 1;
-        EXPECT_EQ(TLIBUnicodeUTF8StrUpper(row.text, nullptr, 0), length) << row.text;
+        std::strcpy(buffer, text);
+        const int length = TLIBUnicodeUTF8StrUpper(text, nullptr, 0);
         EXPECT_EQ(TLIBUnicodeUTF8StrUpper(buffer, buffer, length), length);
-        EXPECT_STREQ(buffer, row.upper);
+        EXPECT_EQ(length, static_cast<int>(std::strlen(buffer)) + 1) << text;
+        story_.Show(text, buffer);
         test::ForgetFault();
-        EXPECT_EQ(TLIBUnicodeUTF8StrUpper(row.text, buffer, length - 1), -1);
+        const std::string upper = buffer;
+        EXPECT_EQ(TLIBUnicodeUTF8StrUpper(text, buffer, length - 1), -1);
         EXPECT_EQ(LastFault(), (Fault{ERR_NOT_ENOUGH_MEMORY, "unicode_utf8_str_upper"}));
-        EXPECT_STREQ(buffer, row.upper);
+        EXPECT_EQ(buffer, upper);
     }
 }
 
