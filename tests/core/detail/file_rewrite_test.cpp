@@ -1,7 +1,6 @@
 // Rewriting files: what is kept of the old file, which file is replaced, and what a failure leaves.
 #include "core/detail/file_rewrite.h"
 
-#include "core/detail/file_append.h"
 #include "core/detail/file_target.h"
 #include "support/test.h"
 
@@ -136,19 +135,6 @@ TEST_F(FileRewriteTest, RemovesAnUnusedTemporaryFile)
         EXPECT_THAT(dir_.Names(), ElementsAre("file", testing::MatchesRegex("file\\..{6}")));
     }
     EXPECT_THAT(dir_.Names(), ElementsAre("file"));
-}
-
-TEST_F(FileRewriteTest, AppendsAfterATornLine)
-{
-    struct Row {
-        const char *old_text, *new_text;
-    };
-    for (const Row row : {Row{"", "k=v\n"}, Row{"a=b\n", "a=b\nk=v\n"}, Row{"a=b\nto", "a=b\nto\nk=v\n"}}) {
-        test::WriteFile(file_, row.old_text);
-        const tavo::Fd fd = tavo::OpenRegular(file_.c_str(), O_RDWR | O_APPEND);
-        EXPECT_TRUE(tavo::AppendText(fd.Get(), "k=v\n"));
-        EXPECT_EQ(test::ReadFile(file_), row.new_text);
-    }
 }
 
 }  // namespace

@@ -1,6 +1,7 @@
 // The lines of settings files: which key a line sets, to what, and what may be written.
 #include "core/detail/key_value_line.h"
 
+#include "support/story.h"
 #include "support/test.h"
 
 using namespace std::string_view_literals;
@@ -9,45 +10,36 @@ namespace {
 
 TEST(KeyValueLine, SetsItsKeyToItsValue)
 {
-    struct Row {
-        std::string_view line;
-        std::string_view key;  // empty: sets none
-        std::string_view value;
-    };
-    constexpr Row rows[] = {
-        {"runsamba=yes\n", "runsamba", "yes"},
-        {"runsamba=yes", "runsamba", "yes"},
-        {"key = \"a b\" \n", "key", "a b"},
-        {"\t key\t=\r\n", "key", ""},
-        {"key==v\n", "key", "=v"},
-        {"key=a=b\n", "key", "a=b"},
-        {"=x\n", "x", ""},
-        {"==x=y\n", "x", "y"},
-        {"\"key\"=v\n", "key", "v"},
-        {"key=\"\n", "key", "\""},
-        {"key=\"\"\n", "key", ""},
-        {"key=\" v \"\n", "key", " v "},
-        {"key=\"\"v\"\"\n", "key", "\"v\""},
-        {"key='v'\n", "key", "'v'"},
-        {"key=v\0w\n"sv, "key", "v"},
-        {"two words=v\n", "two words", "v"},
-        {" #key=v\n", "#key", "v"},
-        {"[a=b]\n", "[a", "b]"},
-        {"#key=v\n", "", ""},
-        {";key=v\n", "", ""},
-        {"key\n", "", ""},
-        {"\n", "", ""},
-        {"", "", ""},
-        {"=\n", "", ""},
-        {"  =v\n", "", ""},
-        {"ke\0y=v\n"sv, "ke\0y"sv, "v"},
-    };
-    for (const Row &row : rows) {
-        EXPECT_EQ(tavo::LineKey(row.line), row.key) << row.line;
-        if (row.key.empty())
-            continue;
-        EXPECT_TRUE(tavo::LineSetsKey(row.line, row.key)) << row.line;
-        EXPECT_EQ(tavo::LineValue(row.line), row.value) << row.line;
+    test::Story story_{TEST_GOLDEN, {}};
+    for (const std::string_view line : {"runsamba=yes\n"sv,
+                                        "runsamba=yes"sv,
+                                        "key = \"a b\" \n"sv,
+                                        "\t key\t=\r\n"sv,
+                                        "key==v\n"sv,
+                                        "key=a=b\n"sv,
+                                        "=x\n"sv,
+                                        "==x=y\n"sv,
+                                        "\"key\"=v\n"sv,
+                                        "key=\"\n"sv,
+                                        "key=\"\"\n"sv,
+                                        "key=\" v \"\n"sv,
+                                        "key=\"\"v\"\"\n"sv,
+                                        "key='v'\n"sv,
+                                        "key=v\0w\n"sv,
+                                        "two words=v\n"sv,
+                                        " #key=v\n"sv,
+                                        "[a=b]\n"sv,
+                                        "#key=v\n"sv,
+                                        ";key=v\n"sv,
+                                        "key\n"sv,
+                                        "\n"sv,
+                                        ""sv,
+                                        "=\n"sv,
+                                        "  =v\n"sv,
+                                        "ke\0y=v\n"sv}) {
+        const std::string key(tavo::LineKey(line));
+        story_.Show(std::string(line), key.empty() ? "sets none" : key + ": " + std::string(tavo::LineValue(line)));
+        EXPECT_TRUE(key.empty() || tavo::LineSetsKey(line, key)) << line;
     }
 }
 
@@ -60,28 +52,22 @@ TEST(KeyValueLine, SetsNoOtherKey)
 
 TEST(KeyValueLine, SplitsAtAnySeparator)
 {
-    struct Row {
-        std::string_view line, separators, key, value;  // no key: skipped
-    };
-    constexpr Row rows[] = {
-        {"nameserver 10.0.0.1\n", " \t", "nameserver", "10.0.0.1"},
-        {"  search  a.example b.example\n", " \t", "search", "a.example b.example"},
-        {"a = b = c\n", "=", "a", "b = c"},
-        {"a:b=c\n", ":=", "a", "b=c"},
-        {"a= \n", "=", "a", ""},
-        {"a=\n", "=", "", ""},
-        {"a\n", "=", "", ""},
-        {" =b\n", "=", "", ""},
-        {"#a=b\n", "=", "", ""},
-        {"", "=", "", ""},
-    };
-    for (const Row &row : rows) {
+    test::Story story_{TEST_GOLDEN, {}};
+    const struct {
+        const char *line, *separators;
+    } rows[] = {{"nameserver 10.0.0.1\n", " \t"},
+                {"  search  a.example b.example\n", " \t"},
+                {"a = b = c\n", "="},
+                {"a:b=c\n", ":="},
+                {"a= \n", "="},
+                {"a=\n", "="},
+                {"a\n", "="},
+                {" =b\n", "="},
+                {"#a=b\n", "="},
+                {"", "="}};
+    for (const auto &row : rows) {
         const auto pair = tavo::SplitLine(row.line, row.separators);
-        ASSERT_EQ(pair.has_value(), !row.key.empty()) << row.line;
-        if (pair) {
-            EXPECT_EQ(pair->key, row.key) << row.line;
-            EXPECT_EQ(pair->value, row.value) << row.line;
-        }
+        story_.Show(row.line, pair ? std::string(pair->key) + ": " + std::string(pair->value) : "skipped");
     }
 }
 
