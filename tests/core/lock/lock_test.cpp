@@ -5,6 +5,7 @@
 #include "support/failing_malloc.h"
 #include "support/own_child.h"
 #include "support/planted_name.h"
+#include "support/story.h"
 #include "support/test.h"
 
 #include <climits>
@@ -110,23 +111,14 @@ bool IsFree(unsigned bit, int operation)
 
 TEST(LockTable, KeepsItsOrder)
 {
-    const struct {
-        const char *name;
-        unsigned bit;
-    } rows[] = {{"tavoinfo", 0x800},  {"pw", 0x10},          {"gr", 0x20},          {"rc", 0x80},
-                {"host", 0x100},      {"smb", 0x40},         {"exports", 0x200},    {"nw", 0x400},
-                {"apple", 0x1000},    {"snmp", 0x2000},      {"win", 0x4000},       {"tapebkp", 0x8000},
-                {"connect", 0x10000}, {"usbidmap", 0x20000}, {"duseruid", 0x40000}, {"dusergid", 0x80000},
-                {"fstab", 0x100000},  {"hotswap", 0x200000}, {"space", 0x400000},   {"ttys1", 0x800000}};
-    ASSERT_EQ(std::size(rgslckList), std::size(rows) + 1);
-    for (size_t i = 0; i < std::size(rows); ++i) {
-        EXPECT_EQ(rgslckList[i].szPath, std::string("/tmp/lock/lock_") + rows[i].name);
-        EXPECT_EQ(rgslckList[i].fLockBit, rows[i].bit) << rows[i].name;
-        EXPECT_EQ(rgslckList[i].pfLock, nullptr);
-        EXPECT_EQ(rgslckList[i].nRef + rgslckList[i].nMode, 0);
+    test::Story story_{TEST_GOLDEN, {}};
+    for (const TLIBLOCKFILE &entry : rgslckList) {
+        char bit[16];
+        std::snprintf(bit, sizeof bit, "0x%X", entry.fLockBit);
+        story_.Show(entry.szPath, std::string(bit));
+        EXPECT_EQ(entry.pfLock, nullptr) << entry.szPath;
+        EXPECT_EQ(entry.nRef + entry.nMode, 0) << entry.szPath;
     }
-    EXPECT_STREQ(rgslckList[20].szPath, "");
-    EXPECT_EQ(rgslckList[20].fLockBit, 0u);
 }
 
 TEST_F(Lock, NestsUntilTheLastUnlock)
@@ -336,20 +328,36 @@ TEST_F(Lock, CreatesDirectoryAndFilesUnderEveryUmask)
     EXPECT_TRUE(fs::is_regular_file("/tmp/lock/lock_smb"));
 }
 
-TEST_F(Lock, TrapsAtTheDirectory)
+TEST_F(Lock, RefusesTraps)
 {
+    const Fault directory = {ERR_CREATE_FAILED, "lock_check_dir", 37}, file = {ERR_OPEN_FAILED, "lock_check_dir", 45};
+    const struct {
+        const char *plant;
+        Fault fault;
+    } rows[] = {{"ln -s /tmp/elsewhere lock", directory},
+                {"ln -s /tmp/nowhere lock", directory},
+                {": >lock", directory},
+                {"mkfifo lock", directory},
+                {"mkdir -m 1777 lock", directory},
+                {"mkdir -m 775 lock", directory},
+                {"mkdir lock && ln -s /tmp/elsewhere/victim lock/lock_pw", file},
+                {"mkdir lock && ln -s /tmp/nowhere lock/lock_pw", file},
+                {"mkdir lock && mkfifo lock/lock_pw", file},
+                {"mkdir -p lock/lock_pw", file},
+                {"mkdir lock && : >lock/lock_pw && chown 1000 lock/lock_pw", file}};
     fs::create_directory("/tmp/elsewhere");
     ASSERT_EQ(::chmod("/tmp/elsewhere", 0700), 0);
-    for (const char *plant : {"ln -s /tmp/elsewhere /tmp/lock", "ln -s /tmp/nowhere /tmp/lock", ": >/tmp/lock",
-                              "mkfifo /tmp/lock", "mkdir -m 1777 /tmp/lock", "mkdir -m 775 /tmp/lock"}) {
-        ASSERT_EQ(std::system(plant), 0) << plant;
+    test::WriteFile("/tmp/elsewhere/victim", "kept");
+    for (const auto &row : rows) {
+        ASSERT_EQ(std::system(("cd /tmp && " + std::string(row.plant)).c_str()), 0) << row.plant;
         test::ForgetFault();
-        EXPECT_EQ(ErrTLIBFileLock(0x806, 0), -1) << plant;
-        EXPECT_EQ(LastFault(), (Fault{ERR_CREATE_FAILED, "lock_check_dir", 37})) << plant;
-        EXPECT_TRUE(fs::is_empty("/tmp/elsewhere")) << plant;
-        EXPECT_FALSE(fs::exists("/tmp/nowhere")) << plant;
+        EXPECT_EQ(ErrTLIBFileLock(0x806, 0), -1) << row.plant;
+        EXPECT_EQ(LastFault(), row.fault) << row.plant;
+        EXPECT_FALSE(fs::exists("/tmp/nowhere")) << row.plant;
         fs::remove_all("/tmp/lock");
     }
+    EXPECT_EQ(std::distance(fs::directory_iterator("/tmp/elsewhere"), {}), 1);
+    EXPECT_EQ(test::ReadFile("/tmp/elsewhere/victim"), "kept");
     struct stat st;
     ASSERT_EQ(::stat("/tmp/elsewhere", &st), 0);
     EXPECT_EQ(st.st_mode & 07777u, 0700u);
@@ -421,23 +429,6 @@ TEST_F(Lock, ATimeOutLogsTheLockAndItsHolder)
     EXPECT_THAT(log.Texts(), ElementsAre(EndsWith(
                                  "Gave up on /tmp/lock/lock_host: this process holds it shared, which does not become "
                                  "exclusive")));
-}
-
-TEST_F(Lock, TrapsAtALockFile)
-{
-    std::ofstream("/tmp/victim") << "kept";
-    for (const char *plant : {"ln -s /tmp/victim lock_pw", "ln -s /tmp/nologin lock_pw", "mkfifo lock_pw",
-                              "mkdir lock_pw", ": >lock_pw && chown 1000 lock_pw"}) {
-        fs::remove_all("/tmp/lock");
-        ASSERT_EQ(::mkdir("/tmp/lock", 0755), 0);
-        ASSERT_EQ(std::system(("cd /tmp/lock && " + std::string(plant)).c_str()), 0) << plant;
-        test::ForgetFault();
-        EXPECT_EQ(ErrTLIBFileLock(0x806, 0), -1) << plant;
-        EXPECT_EQ(LastFault(), (Fault{ERR_OPEN_FAILED, "lock_check_dir", 45})) << plant;
-        EXPECT_FALSE(fs::exists("/tmp/nologin")) << plant;
-    }
-    EXPECT_EQ(fs::file_size("/tmp/victim"), 4u);
-    fs::remove("/tmp/victim");
 }
 
 // A cleaner of /tmp, or a second instance of the appliance's start-up, removes the files of a lock that is being taken.
