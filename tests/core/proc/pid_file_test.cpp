@@ -21,42 +21,28 @@ std::string Number(long number)
 TEST(PidFile, ParsesOneNumber)
 {
     const std::string own = std::to_string(::getpid());
-    const struct {
-        std::string text;
-        pid_t pid;
-    } rows[] = {{own + "\n", ::getpid()},
-                {own, ::getpid()},
-                {"   " + own + " \r\n", ::getpid()},
-                {own + "\nwhatever follows\n", ::getpid()},
-                {"1\n", 1},
-                {"", 0},
-                {"\n" + own + "\n", 0},
-                {"0\n", 0},
-                {"-1\n", 0},
-                {"+1\n", 0},
-                {"-" + own + "\n", 0},
-                {"4294967295\n", 0},
-                {"4294967297\n", 0},
-                {"4194305\n", 0},
-                {"18446744073709551617\n", 0},
-                {std::string(300, '9'), 0},
-                {std::string(300, ' ') + own, 0},
-                {"smbd\n", 0},
-                {own + "x\n", 0},
-                {own + " 1\n", 0},
-                {"0x1\n", 0},
-                {own + std::string("\0\n", 2), 0}};
     const test::ScratchDir dir;
     const std::string path = dir / "x.pid";
-    for (const auto &row : rows) {
-        test::WriteFile(path, row.text);
+    const auto reads = [&](const std::string &text, pid_t pid) {
+        test::WriteFile(path, text);
         test::ForgetFault();
-        EXPECT_EQ(TLIBReadPidFile(path.c_str()), row.pid) << row.text;
-        EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS) << row.text;
-        EXPECT_EQ(TLIBProcSignalByPidFile(path.c_str(), 0), row.pid > 0 ? 0 : -1) << row.text;
-        EXPECT_EQ(LastFault(), (row.pid > 0 ? Fault{} : Fault{ERR_OPEN_FAILED, "proc_signal_by_pid_file"})) << row.text;
-        EXPECT_EQ(TLIBProcAliveByPidFile(path.c_str()), row.pid > 0) << row.text;
-    }
+        EXPECT_EQ(TLIBReadPidFile(path.c_str()), pid) << text;
+        EXPECT_EQ(TLIBErrGet(), ERR_SUCCESS) << text;
+        EXPECT_EQ(TLIBProcSignalByPidFile(path.c_str(), 0), pid > 0 ? 0 : -1) << text;
+        EXPECT_EQ(LastFault(), (pid > 0 ? Fault{} : Fault{ERR_OPEN_FAILED, "proc_signal_by_pid_file"})) << text;
+        EXPECT_EQ(TLIBProcAliveByPidFile(path.c_str()), pid > 0) << text;
+    };
+    const auto own_pid_in = [&](std::string text) {
+        const size_t at = text.find('%');
+        return at == text.npos ? text : text.replace(at, 1, own);
+    };
+    for (const char *text : {"%\n", "%", "   % \r\n", "%\nwhatever follows\n", "1\n"})
+        reads(own_pid_in(text), *text == '1' ? 1 : ::getpid());
+    for (const char *text : {"", "\n%\n", "0\n", "-1\n", "+1\n", "-%\n", "4294967295\n", "4294967297\n", "4194305\n",
+                             "18446744073709551617\n", "smbd\n", "%x\n", "% 1\n", "0x1\n"})
+        reads(own_pid_in(text), 0);
+    for (const std::string &text : {std::string(300, '9'), std::string(300, ' ') + own, own + std::string("\0\n", 2)})
+        reads(text, 0);
 }
 
 TEST(PidFile, Refusals)
