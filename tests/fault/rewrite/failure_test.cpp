@@ -1,5 +1,4 @@
 // Calls that fail and disks that are full: every writer reports its code and leaves the old text, and no other file.
-#include "tavo_lock.h"
 #include "tavo_proc.h"
 
 #include "interposed_calls.h"
@@ -117,19 +116,6 @@ TEST(FailingCalls, OfTheDirectoryAreOnlyLogged)
         for (const test::Writer &writer : test::kAppenders)
             logs(writer, dir / writer.name);
     }
-}
-
-TEST(FailingCalls, OfTheSystemSettingsReleaseTheirLock)
-{
-    if (test::RootForm().empty())
-        GTEST_SKIP() << "only in an appliance root";
-    test::WriteFile("/etc/tavoinfo.conf", "runsamba=no\n");
-    test::FailCalls(Call::write, ENOSPC);
-    EXPECT_EQ(TAVOINFOSetKeyValue("runsamba", "yes"), -1);
-    test::FailCalls(Call::none, 0);
-    EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, "file_set_key_value"}));
-    EXPECT_EQ(rgslckList[0].pfLock, nullptr);
-    EXPECT_EQ(test::ReadFile("/etc/tavoinfo.conf"), "runsamba=no\n");
 }
 
 // On the file system of /etc/skel a comment begins in a scratch file there. Without its lock that file is not used, and the
@@ -288,22 +274,6 @@ class FullDisk : public testing::Test {
         kOldText + std::string(static_cast<size_t>(::sysconf(_SC_PAGESIZE)) * 2 - kOldText.size() - 1, '#') + "\n";
     bool mounted_ = false;
 };
-
-TEST_F(FullDisk, FailsEveryWriterAndLeavesTheOldText)
-{
-    for (const int free_pages : {0, 1}) {
-        Fill(free_pages);
-        for (const test::Writer &writer : test::kRewriters) {
-            test::ForgetFault();
-            EXPECT_EQ(writer.write(file_.c_str()), -1) << writer.name;
-            EXPECT_EQ(LastFault(), (Fault{ERR_WRITE_FAILED, writer.module})) << writer.name;
-            EXPECT_EQ(test::ReadFile(file_), text_) << writer.name;
-            EXPECT_THAT(dir_.Names(), ElementsAre("ballast", "file")) << writer.name;
-        }
-    }
-    ::unlink(ballast_.c_str());
-    EXPECT_EQ(TLIBFileSetKeyValue(file_.c_str(), "key", "new", nullptr), 1) << "with room it works";
-}
 
 TEST_F(FullDisk, FailsEveryAppenderAndCreator)
 {

@@ -4,7 +4,6 @@
 #include <cerrno>
 #include <csignal>
 #include <cstdio>
-#include <utility>
 
 #include <fcntl.h>
 #include <sys/file.h>
@@ -20,7 +19,6 @@ int stop_at;
 int calls_made;
 Call failing = Call::none;
 int failing_with;
-Syncs syncs;
 char renamed_from[4096];
 
 bool Reached()
@@ -70,11 +68,6 @@ const char *RenamedFrom()
     return renamed_from;
 }
 
-Syncs TakeSyncs()
-{
-    return std::exchange(syncs, {});
-}
-
 }  // namespace test
 
 using test::Call;
@@ -116,10 +109,9 @@ ssize_t write(int fd, const void *data, size_t size)
 
 int fsync(int fd)
 {
-    const bool directory = test::IsDirectory(fd);
-    ++(directory ? test::syncs.directories : test::syncs.files);
-    return Fails(directory ? Call::fsync_directory : Call::fsync_file) ? -1
-                                                                       : static_cast<int>(::syscall(SYS_fsync, fd));
+    return Fails(test::IsDirectory(fd) ? Call::fsync_directory : Call::fsync_file)
+               ? -1
+               : static_cast<int>(::syscall(SYS_fsync, fd));
 }
 
 int fchmod(int fd, mode_t mode) noexcept

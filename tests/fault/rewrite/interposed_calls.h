@@ -22,13 +22,6 @@ void FailCalls(Call call, int error);
 // The name that the last rename removed.
 const char *RenamedFrom();
 
-// How often each was made since the last question.
-struct Syncs {
-    int files = 0;
-    int directories = 0;
-};
-Syncs TakeSyncs();
-
 }  // namespace test
 
 #endif

@@ -149,8 +149,7 @@ TEST_F(Planted, RefusesSpecialFilesAtOnce)
 {
     const std::string fifo = dir_ / "fifo";
     ASSERT_EQ(::mkfifo(fifo.c_str(), 0666), 0);
-    test::Owned<TLIBSZLIST> list = test::ListOf({});
-    test::Owned<TLIBSZHASH> hash = test::HashOf({});
+    test::Room room;
     for (const std::string &path : {fifo, dir_.Path(), std::string("/dev/zero"), std::string("/dev/full")}) {
         const char *at = path.c_str();
         const bool directory = path == dir_.Path();
@@ -164,10 +163,10 @@ TEST_F(Planted, RefusesSpecialFilesAtOnce)
             const int code = directory && key ? ERR_BAD_PARAMETERS : ERR_OPEN_FAILED;
             EXPECT_EQ(test::LastFault(), (test::Fault{code, writer.module})) << path;
         }
-        for (const int result :
-             {TLIBFileGetKeyValue(at, "key", nullptr, 0, 0), TLIBFileMatchLineNo(at, "key"),
-              TLIBFileGetKeys(at, nullptr, hash, "="), TLIBFileReadLines(at, list), TLIBFileGetSection(at, "net", hash),
-              TLIBFileEnumSection(at, list), TLIBFileGetLine(at, 1, nullptr, 0), TLIBFileTouch(at)})
+        for (const test::Reader &reader : test::kReaders)
+            EXPECT_EQ(reader.read(at, room.hash, room.list), -1) << reader.module << " " << path;
+        for (const int result : {TLIBFileGetKeyValue(at, "key", nullptr, 0, 0), TLIBFileMatchLineNo(at, "key"),
+                                 TLIBFileGetLine(at, 1, nullptr, 0), TLIBFileTouch(at)})
             EXPECT_EQ(result, -1) << path;
     }
     EXPECT_THAT(dir_.Names(), testing::ElementsAre("fifo", "file", "victim"));

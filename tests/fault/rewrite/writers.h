@@ -61,28 +61,22 @@ struct Reader {
     int (*read)(const char *path, TLIBSZHASH **hash, TLIBSZLIST **list);
 };
 
+#define READER(module, call)                                                                                           \
+    {                                                                                                                  \
+        module, []([[maybe_unused]] auto *path, [[maybe_unused]] auto **hash, [[maybe_unused]] auto **list) {          \
+            return call;                                                                                               \
+        }                                                                                                              \
+    }
+
 inline constexpr Reader kReaders[] = {
-    {"file_get_keys",
-     [](auto *path, auto **hash, auto **) {
-         return TLIBFileGetKeys(path, nullptr, hash, "=");
-     }},
-    {"file_get_keys",
-     [](auto *path, auto **hash, auto **list) {
-         return TLIBFileGetKeys(path, *list, hash, "=");
-     }},
-    {"file_get_section",
-     [](auto *path, auto **hash, auto **) {
-         return TLIBFileGetSection(path, "net", hash);
-     }},
-    {"file_enum_section",
-     [](auto *path, auto **, auto **list) {
-         return TLIBFileEnumSection(path, list);
-     }},
-    {"file_read_lines",
-     [](auto *path, auto **, auto **list) {
-         return TLIBFileReadLines(path, list);
-     }},
+    READER("file_get_keys", TLIBFileGetKeys(path, nullptr, hash, "=")),
+    READER("file_get_keys", TLIBFileGetKeys(path, *list, hash, "=")),
+    READER("file_get_section", TLIBFileGetSection(path, "net", hash)),
+    READER("file_enum_section", TLIBFileEnumSection(path, list)),
+    READER("file_read_lines", TLIBFileReadLines(path, list)),
 };
+
+#undef READER
 
 // Containers that have to grow; "key" is wanted.
 struct Room {
