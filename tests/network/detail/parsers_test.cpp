@@ -5,7 +5,6 @@
 #include "network/detail/interface_name.h"
 #include "network/detail/ipv6_route_table.h"
 #include "network/detail/route_table.h"
-#include "network/detail/socket_table.h"
 #include "network/detail/undo_step.h"
 #include "support/test.h"
 
@@ -59,27 +58,6 @@ TEST(Ipv6RouteTable, HasTheRoutesThatWereSet)
     for (const tavo::LiveIpv6Route &route : tavo::ParseIpv6RouteTable(table, "eth0"))
         found += route.destination + " via " + route.gateway + "\n";
     EXPECT_EQ(found, "::/0 via 2001:db8::1\n2001:db8::/48 via \n2001:db8::/64 via 2001:db8::1\n");
-}
-
-TEST(SocketTable, FindsTheLocalPort)
-{
-    const struct {
-        const char *row;
-        int port;  // -1: none
-    } rows[] = {
-        {"   0: 0100007F:1F90 00000000:0000 0A 00000000:00000000 00:00000000 00000000     0        0 1 1", 0x1F90},
-        {"  12: 00000000000000000000000001000000:0016 0000:0000 0A", 22},
-        {"1234: 00000000:270F", 9999},
-        {"  sl  local_address rem_address   st tx_queue", -1},
-        {"   0: :1F90 00000000:0000", -1},
-        {"   0: 0100007F:11F90 00000000:0000", -1},
-        {"   0: 0100007F:1F9x", -1},
-        {"   0: 0100007F", -1},
-        {"", -1},
-        {"    ", -1},
-    };
-    for (const auto &row : rows)
-        EXPECT_EQ(tavo::LocalPort(row.row).value_or(-1), row.port) << row.row;
 }
 
 TEST(Bonding, Partner)

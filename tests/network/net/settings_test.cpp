@@ -306,46 +306,6 @@ TEST_F(NetSettings, ReportsFilesThatCannotBeReadOrWritten)
     }
 }
 
-// The record that the next change would undo, as it is while the last command runs.
-TEST_F(NetSettings, AChangeRecordsWhatItMayTouch)
-{
-    bool dead = false;
-    commands_.OnCommand([&dead](const std::string &) {
-        std::error_code none;
-        if (!dead)
-            std::filesystem::copy_file("/etc/network.undo", "/etc/dhcpc/undo",
-                                       std::filesystem::copy_options::overwrite_existing, none);
-        return test::CommandReply{};
-    });
-    WriteFile("/etc/hosts", "127.0.0.1\tlocalhost\n192.0.2.10\ttavo\n");
-    WriteFile("/etc/resolv.conf", "nameserver 192.0.2.53\n");
-    WriteFile("/etc/tavoinfo.conf", "eth0_mtu=9000\n");
-    WriteFile(kLease, "IPADDR=192.0.2.77\nNETMASK=255.255.255.0\n");
-    // And the program had died then.
-    const auto tell = [&](const char *text, auto call) {
-        story_.Tell(text, call);
-        dead = ::rename("/etc/dhcpc/undo", "/etc/network.undo") == 0;
-        if (dead)
-            TELL(TAVONetHostsRefresh());
-        dead = false;
-        EXPECT_FALSE(std::filesystem::exists("/etc/network.undo"));
-    };
-#define CUT_OFF(...) tell(#__VA_ARGS__, [&] { return __VA_ARGS__; })
-    CUT_OFF(SetCard(TAVO_NET_STATIC, "192.0.2.20", "255.255.255.0"));
-    CUT_OFF(SetCard(TAVO_NET_DHCP));
-    CUT_OFF(TAVONetDefaultGatewaySet("192.0.2.254"));
-    CUT_OFF(TAVONetSetMTUValue("eth0", 1400));
-    CUT_OFF(TAVONetRouteAdd("10.20.0.0", "255.255.0.0", "eth0"));
-    CUT_OFF(TAVONetRouteDel("10.20.0.0", "255.255.0.0", "eth0"));
-    CUT_OFF(TAVONetIPv6AddrAdd("eth0", "2001:db8::7", 64));
-    CUT_OFF(TAVONetIPv6AddrDel("eth0", "2001:db8::7", 64));
-    CUT_OFF(TAVONetIPv6RouteAdd("eth0", "2001:db8:1::", 48, "fe80::1"));
-    CUT_OFF(TAVONetIPv6RouteDel("eth0", "2001:db8:1::", 48, nullptr));
-    SetRoutes("");
-    CUT_OFF(TAVONetIPv6Set("eth0", 0));
-#undef CUT_OFF
-}
-
 TEST_F(NetSettings, ACheckpointHasTheWholeNetwork)
 {
     AddCard("eth1");
@@ -355,7 +315,6 @@ TEST_F(NetSettings, ACheckpointHasTheWholeNetwork)
     tree_.Put("/sys/class/net/bond0/bonding/mode", "802.3ad 4\n");
     tree_.Put("/sys/class/net/bond0/bonding/slaves", "eth0 eth1\n");
     tree_.Put("/sys/class/net/lo/type", "772\n");
-    tree_.Put("/proc/sys/net/ipv6/conf/eth0/disable_ipv6", "0\n");
     tree_.Put("/proc/net/if_inet6", "20010db8000000000000000000000001 02 40 00 80     eth0\n");
     WriteFile("/etc/hosts", "127.0.0.1\tlocalhost\n192.0.2.10\ttavo\n");
     WriteFile("/etc/resolv.conf", "nameserver 192.0.2.53\n");
@@ -483,11 +442,15 @@ TEST_F(NetSettings, IPv6IsSwitchedForOneInterface)
 TEST_F(NetSettings, APortIsInUseWhenASocketHasIt)
 {
     const std::string header = "  sl  local_address rem_address   st\n";
-    tree_.Put("/proc/net/tcp", header + "   0: 0100007F:1F90 00000000:0000 0A\n");
+    tree_.Put("/proc/net/tcp", header + "   0: 0100007F:1F90 00000000:0000 0A\n"
+                                        "   0: :1F92 00000000:0000\n   0: 0100007F:11F92 00000000:0000\n"
+                                        "   0: 0100007F:1F92x\n   0: 0100007F\n\n    \n1234: 00000000:2710");
     tree_.Put("/proc/net/udp", header + "  12: 00000000:270F 00000000:0000 07\n");
     TELL(BlTLIBIsPortInUse(8080));
     TELL(BlTLIBIsPortInUse(9999));
-    TELL(BlTLIBIsPortInUse(10));  // a state is not a port
+    TELL(BlTLIBIsPortInUse(10000));
+    TELL(BlTLIBIsPortInUse(8082));  // in broken rows alone
+    TELL(BlTLIBIsPortInUse(10));    // a state is not a port
     tree_.Put("/proc/net/tcp6",
               header + "   0: " + std::string(32, '0') + ":1F91 " + std::string(32, '0') + ":0000 0A\n");
     TELL(BlTLIBIsPortInUse(8081));
