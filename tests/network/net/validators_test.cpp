@@ -86,16 +86,6 @@ TEST(Validators, AcceptAndRefuse)
     }
 }
 
-TEST(IsIpMask, WritesTheCanonicalForm)
-{
-    char mask[] = "255.255.000.00";
-    EXPECT_EQ(BlTLIBIsIpMask(mask), 1);
-    EXPECT_STREQ(mask, "255.255.0.0");
-    char broken[] = "255.000.255.0";
-    EXPECT_EQ(BlTLIBIsIpMask(broken), 0);
-    EXPECT_STREQ(broken, "255.000.255.0") << "a refused text stays as it is";
-}
-
 TEST(Conversions, SubnetsAndMasks)
 {
     const struct {
