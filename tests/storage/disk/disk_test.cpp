@@ -282,21 +282,9 @@ TEST_F(Disk, NameOfADescriptorIsTheKernels)
 
 class Layout : public test::StorageStory {
   protected:
-    struct Fenced {
-        unsigned char before[4096];
-        TavoPartitionLayout layout;
-        unsigned char after[4096];
-    };
+    Layout() { std::memset(layout_.get(), 0x5A, sizeof *layout_); }
 
-    Layout() { std::memset(fenced_.get(), 0x5A, sizeof *fenced_); }
-    ~Layout() override
-    {
-        for (const auto &fence : {fenced_->before, fenced_->after})
-            EXPECT_EQ(std::count(fence, fence + sizeof fenced_->before, 0x5A), 4096);
-    }
-
-    const std::unique_ptr<Fenced> fenced_ = std::make_unique<Fenced>();
-    TavoPartitionLayout *const layout_ = &fenced_->layout;
+    const std::unique_ptr<TavoPartitionLayout> layout_ = std::make_unique<TavoPartitionLayout>();
 };
 
 TEST_F(Layout, TakesTheRowsOfItsDiskAlone)
@@ -308,7 +296,7 @@ TEST_F(Layout, TakesTheRowsOfItsDiskAlone)
               "   8 9 1 xsda2\n   8 9 1 sda1" +
                   std::string(5000, 'z') + "\n");
     const auto get = [&] {
-        TELL(DiskPartitionsLayoutGet("sda", layout_));
+        TELL(DiskPartitionsLayoutGet("sda", layout_.get()));
         story_.Show("kind", layout_->nKind);
         story_.Show("disk", layout_->szDisk);
         story_.Show("entries", layout_->nEntry);
@@ -324,14 +312,14 @@ TEST_F(Layout, TakesTheRowsOfItsDiskAlone)
     tree_.Put("/proc/partitions", "   8  0  98304 sdb\n");
     get();
     tree_.Remove("/proc/partitions");
-    TELL(DiskPartitionsLayoutGet("sda", layout_));
-    TELL(DiskPartitionsLayoutGet("s", layout_));
+    TELL(DiskPartitionsLayoutGet("sda", layout_.get()));
+    TELL(DiskPartitionsLayoutGet("s", layout_.get()));
 }
 
 TEST_F(Layout, KnowsSystemDisksAndSpecialDevices)
 {
     const auto get = [&] {
-        TELL(DiskPartitionsLayoutGet("sdb", layout_));
+        TELL(DiskPartitionsLayoutGet("sdb", layout_.get()));
         story_.Show("kind", layout_->nKind);
         story_.Show("second entry", layout_->rgEntry[2].nKind);
         story_.Show("third entry", layout_->rgEntry[3].nKind);
