@@ -53,9 +53,9 @@ const struct Work {
 void ExpectNothingLeft()
 {
     EXPECT_NE(::access("/etc/.tavoaccount.commit", F_OK), 0);
-    for (const char *path : {"/etc/passwd.tmp", "/etc/shadow.tmp", "/etc/tavouser.conf.tmp", "/etc/group_tmp",
-                             "/etc/group_desc.tmp", "/usr/tavo/etc/private/smbpasswd.tmp"})
-        EXPECT_NE(::access(path, F_OK), 0) << path;
+    EXPECT_NE(::access("/etc/group_tmp", F_OK), 0);
+    for (const char *path : test::kFiles)
+        EXPECT_NE(::access((path + std::string(".tmp")).c_str(), F_OK), 0) << path;
     const auto scratch = std::filesystem::path("/volume1/@tmp");
     EXPECT_TRUE(!std::filesystem::exists(scratch) || std::filesystem::is_empty(scratch));
 }

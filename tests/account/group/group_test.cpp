@@ -119,36 +119,20 @@ TEST_F(Groups, RefusalsLeaveTheFiles)
     StartWith(65600);
     ASSERT_EQ(AddGroup("staff"), 0);
     ASSERT_EQ(TAVOGroupDescSet("staff", "kept"), 0);
-    const struct {
-        const char *old_name;
-        std::string name;
-        int gid;
-        Names members;
-    } rows[] = {
-        {nullptr, "STAFF", -1, {}},
-        {"lp", "Staff", 7, {}},
-        {"ghost", "staff", -1, {}},
-        {nullptr, std::string(16, 'g'), -1, {}},
-        {nullptr, "a:b", -1, {}},
-        {nullptr, "a\nroot:x:0:eve", -1, {}},
-        {nullptr, "..", -1, {}},
-        {nullptr, "", -1, {}},
-        {nullptr, "\xFF\xFE", -1, {}},
-        {nullptr, std::string(4096, 'g'), -1, {}},
-        {nullptr, "DOM\\staff", -1, {}},
-        {nullptr, "new", -2, {}},
-        {nullptr, "new", -1, {"a,b"}},
-        {nullptr, "new", -1, {"a:b"}},
-        {nullptr, "new", -1, {"alice", "eve\nroot:x:0:eve"}},
-        {nullptr, "new", -1, {"a\x1B[2J"}},
-        {nullptr, "new", -1, {".."}},
-        {nullptr, "new", -1, {std::string(4096, 'm')}},
-        {"staff", "staff", -1, {"a,b"}},
-    };
-    for (const auto &row : rows) {
-        story_.Head(row.name.substr(0, 20) + (row.members.empty() ? "" : " with " + row.members.back().substr(0, 20)));
-        TELL(SetGroup(row.old_name, row.name, row.gid, row.members));
+    for (const std::string &name : {"STAFF"s, std::string(16, 'g'), "a:b"s, "a\nroot:x:0:eve"s, ".."s, ""s, "\xFF\xFE"s,
+                                    std::string(4096, 'g'), "DOM\\staff"s}) {
+        story_.Head(name.substr(0, 20));
+        TELL(AddGroup(name));
     }
+    for (const Names &members :
+         {Names{"a,b"}, {"a:b"}, {"alice", "eve\nroot:x:0:eve"}, {"a\x1B[2J"}, {".."}, {std::string(4096, 'm')}}) {
+        story_.Head("with " + members.back().substr(0, 20));
+        TELL(AddGroup("new", -1, members));
+    }
+    TELL(AddGroup("new", -2));
+    TELL(SetGroup("lp", "Staff", 7));
+    TELL(SetGroup("ghost", "staff"));
+    TELL(SetGroup("staff", "staff", -1, {"a,b"}));
     TELL(TAVOGroupSet(nullptr, nullptr));
     for (const std::string &text : {std::string("a:b"), std::string("a\nb:c"), std::string(513, 'd')})
         TELL(TAVOGroupDescSet("staff", text.c_str()));
