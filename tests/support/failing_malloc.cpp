@@ -81,15 +81,14 @@ bool EachAllocation::Next()
 
 void EachAllocation::Arm()
 {
-    StartCounting();
-    FailAllocation(round_);
+    armed = {.on = true, .until_failure = round_};
 }
 
 void EachAllocation::Disarm()
 {
     if (!armed.on)
         return;
-    fired_ = AllocationFailed();
+    fired_ = armed.fired;
     left_allocated_ = StopCounting();
 }
 

@@ -1,4 +1,4 @@
-// What the rest of the appliance says and is told: expansion units, daemons, Samba's settings, domain accounts.
+// How the library asks and signals the rest of the appliance: expansion units, daemons, Samba's settings, domain accounts.
 #include "tavo_appliance.h"
 #include "tavo_proc.h"
 
