@@ -43,6 +43,7 @@ class CommandStory {
             Run(words);
     }
     void Head(const std::string &text) { story_.Head(text); }
+    void Mask(const std::string &pattern, const std::string &text) { story_.Mask(pattern, text); }
 
   private:
     // Without the second of the last change.

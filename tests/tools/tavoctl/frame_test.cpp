@@ -31,7 +31,8 @@ class NeedsPrograms : public testing::Environment {
 // Beyond what the contract over all verbs asks of each.
 TEST(TavoctlFrame, WrongCommandLinesAreUsageAndSayNothingOnStandardOutput)
 {
-    const Words lines[] = {
+    test::CommandStory story({"/tmp/new"});
+    story.Run({
         {},
         {"nonsense"},
         {"conf"},
@@ -69,14 +70,7 @@ TEST(TavoctlFrame, WrongCommandLinesAreUsageAndSayNothingOnStandardOutput)
         {"quota", "set", "admin", "1", "--", "-1M"},
         {"quota", "set", "admin", "1", "nan"},
         {"quota", "set", "admin", "1", "1KB"},
-    };
-    for (const Words &words : lines) {
-        const test::Ran ran = Tavoctl(words);
-        EXPECT_EQ(ran.status, 2) << testing::PrintToString(words) << ran;
-        EXPECT_EQ(ran.out, "") << testing::PrintToString(words);
-        EXPECT_EQ(test::Lines(ran.err).size(), 1u) << testing::PrintToString(words) << ran.err;
-    }
-    EXPECT_FALSE(std::filesystem::exists("/tmp/new"));
+    });
 }
 
 TEST(TavoctlFrame, FailureNamesCodePlaceAttemptAndHintOnOneLine)
@@ -89,39 +83,30 @@ TEST(TavoctlFrame, FailureNamesCodePlaceAttemptAndHintOnOneLine)
 
 TEST(TavoctlFrame, ForeignMachineIsNotChanged)
 {
-    const ScratchDir dir;
     const std::string before = ReadFile("/etc/tavoinfo.conf");
-    const std::string aside = dir / "defaults";
-    std::filesystem::copy_file("/etc.defaults/tavoinfo.conf", aside);
-    std::filesystem::remove("/etc.defaults/tavoinfo.conf");
-    const Words lines[] = {
+    std::filesystem::rename("/etc.defaults/tavoinfo.conf", "/root/defaults");
+    test::CommandStory story({"/etc", "/root", "/usr/tavo/etc"});
+    story.Run({
         {"conf", "set", "key", "value"},
         {"conf", "append", "key", "value"},
         {"conf", "remove", "runsamba"},
         {"conf", "comment", "runsamba"},
-        {"section", "add", "--file", dir / "sections", "name", "a=b"},
+        {"section", "add", "--file", "/root/sections", "name", "a=b"},
         {"section", "remove", "--yes", "--file", "/etc/tavoinfo.conf", "name"},
-        {"lock", "run", "tavoinfo", "--", "/bin/touch", dir / "ran"},
-        {"proc", "run", "/bin/touch", dir / "ran"},
+        {"lock", "run", "tavoinfo", "--", "/bin/touch", "/root/ran"},
+        {"proc", "run", "/bin/touch", "/root/ran"},
         {"user", "add", "--empty-password", "eve"},
         {"user", "delete", "--yes", "admin"},
         {"user", "import", "/dev/null"},
         {"group", "add", "eves"},
         {"quota", "off", "1"},
-    };
-    for (const Words &words : lines)
-        test::IsRefused(words, "--force-host", 1);
-    EXPECT_EQ(ReadFile("/etc/tavoinfo.conf"), before);
-    EXPECT_EQ(dir.Names(), std::vector<std::string>{"defaults"});
-
-    // Looking is allowed, and so is meaning it.
-    EXPECT_EQ(Tavoctl({"conf", "set", "--dry-run", "key", "value"}).status, 0);
+        // Looking is allowed, and so is meaning it.
+        {"conf", "set", "--dry-run", "key", "value"},
+        {"conf", "set", "--force-host", "key", "value"},
+    });
     EXPECT_EQ(test::Facts({"version", "--json"}).at("appliance"), false);
-    EXPECT_EQ(ReadFile("/etc/tavoinfo.conf"), before);
-    EXPECT_EQ(Tavoctl({"conf", "set", "--force-host", "key", "value"}).status, 0);
-    EXPECT_EQ(ReadFile("/etc/tavoinfo.conf"), before + "key=\"value\"\n");
 
-    std::filesystem::copy_file(aside, "/etc.defaults/tavoinfo.conf");
+    std::filesystem::rename("/root/defaults", "/etc.defaults/tavoinfo.conf");
     WriteFile("/etc/tavoinfo.conf", before);
 }
 
@@ -316,12 +301,11 @@ TEST(TavoctlFrame, ErrorCodesAreTheLibrarysOwn)
     for (std::size_t i = 0; i < listed.size(); ++i)
         EXPECT_TRUE(listed[i] || !*rgszErrMsg[i]) << rgszErrMsg[i];
 
-    const json explained = test::Facts({"error", "explain", "--json", "0x0400"});
-    EXPECT_EQ(explained.at("name"), "ERR_LOCK_FAILED");
-    for (const char *form : {"1024", "0X400", "ERR_LOCK_FAILED", "err_lock_failed", "Lock_Failed"})
-        EXPECT_EQ(test::Facts({"error", "explain", "--json", form}), explained) << form;
-    for (const char *form : {"0x0401", "-1024", "0x", "1024 ", "ERR_", "99999999999"})
-        EXPECT_EQ(Tavoctl({"error", "explain", "--", form}).status, 3) << form;
+    test::CommandStory story({});
+    story.Run({"error", "explain", "--json", "0x0400"});
+    for (const char *form : {"1024", "0X400", "ERR_LOCK_FAILED", "err_lock_failed", "Lock_Failed",  // all the same
+                             "0x0401", "-1024", "0x", "1024 ", "ERR_", "99999999999"})
+        story.Run({"error", "explain", "--", form});
 }
 
 TEST(TavoctlFrame, VersionNamesMachineAndLibrary)
