@@ -303,7 +303,7 @@ TEST(TavoctlFrame, ErrorCodesAreTheLibrarysOwn)
 
     test::CommandStory story({});
     story.Run({"error", "explain", "--json", "0x0400"});
-    for (const char *form : {"1024", "0X400", "ERR_LOCK_FAILED", "err_lock_failed", "Lock_Failed",  // all the same
+    for (const char *form : {"1024", "0X400", "ERR_LOCK_FAILED", "err_lock_failed", "Lock_Failed",  // one code
                              "0x0401", "-1024", "0x", "1024 ", "ERR_", "99999999999"})
         story.Run({"error", "explain", "--", form});
 }
