@@ -252,6 +252,8 @@ TEST_P(MachineArrays, AReshapeGoesOnWhenItsArrayIsStartedAgain)
 // Another program began to spread it, and the power failed before a copy of the first stripes was written.
 TEST_P(MachineArrays, AReshapeThatHasMovedNothingIsTakenBack)
 {
+    for (const char *other : {"/dev/sde", "/dev/sdf"})
+        RAIDSBClean(other);  // they may hold another array of that name
     ASSERT_EQ(Make("/dev/md2", RAID_LEVEL_5, {"/dev/sda", "/dev/sdb", "/dev/sdc"}), 0);
     const std::string sum = Fill("/dev/md2", 32);
     Told("tavoctl raid add --yes md2 sdd && cd /sys/block/md2/md && echo 0 >sync_max && echo 4 >raid_disks && "

@@ -1,4 +1,5 @@
-// What tests on the machine's own disks share: disks that are blank, or had a life. After each case the machine is as it was: no arrays or volumes, disks empty.
+// What tests on the machine's own disks share: disks that are blank, or had a life. After each case the machine is as it
+// was: no arrays or volumes, disks empty.
 #ifndef TESTS_STORAGE_MACHINE_REAL_STORAGE_H
 #define TESTS_STORAGE_MACHINE_REAL_STORAGE_H
 
@@ -158,9 +159,13 @@ inline std::string Disk(int bay)
     return std::string("/dev/sd") + static_cast<char>('a' + bay - 1);
 }
 
-// The disks in bays 1 to count, replaced by others of that size.
+// The disks in bays 1 to count, replaced by others of that size; the others are blank.
 inline void PlugLargeDisks(int count, int mib)
 {
+    for (int bay = count + 1; bay <= 6 && current_life != "blank"; ++bay) {
+        Happen("pull " + std::to_string(bay));
+        Happen("plug " + std::to_string(bay) + " --blank");
+    }
     for (int bay = 1; bay <= count; ++bay) {
         Happen("pull " + std::to_string(bay));
         Happen("plug " + std::to_string(bay) + " --blank " + std::to_string(mib));
@@ -179,8 +184,12 @@ inline void Partition(int bay)
 inline void PlugSystemDisks(int count, int mib)
 {
     PlugLargeDisks(count, mib);
-    for (int bay = 1; bay <= count; ++bay)
+    for (int bay = 1; bay <= count; ++bay) {
+        if (current_life == "volume") {  // partitions at the same places would show its arrays again
+            EXPECT_EQ(PartitionClean(Disk(bay).c_str(), PARTITION_SYSTEM | PARTITION_DATA), 0);
+        }
         Partition(bay);
+    }
 }
 
 // As when the kernel finds that a member does not answer.

@@ -22,6 +22,12 @@ INSTANTIATE_TEST_SUITE_P(, MachineUsedDisks, testing::ValuesIn(test::Lives()), t
 
 void MakeVolume()
 {
+    // An array made again of the same members shows the group that it held.
+    LVMVG before;
+    if (LVMVgSBGet("/dev/vg1", &before) == 1) {
+        EXPECT_THAT(Shell("tavoctl volume create --yes 1 md2").output, HasSubstr("tavoctl lvm remove removes it"));
+        Told("tavoctl lvm remove --yes vg1");
+    }
     Told("tavoctl volume create --yes 1 md2 && dd if=/dev/urandom of=/volume1/data bs=64k count=64 && sync");
 }
 
@@ -206,6 +212,7 @@ TEST_P(MachineUsedDisks, LeavesAForeignStickAlone)
     ASSERT_THAT(stick, testing::StartsWith("/dev/sd"));
     // A group that is not active, over nothing but the stick, and a stray physical volume on a disk.
     Told("tavoctl volume create --yes 9 " + stick + " && tavoctl volume unmount 9 && sync");
+    RAIDSBClean("/dev/sdb");  // LVM takes no member of an array
     ASSERT_EQ(LVMPvCreate("/dev/sdb"), 0);
     const std::string before = Told("blockdev --flushbufs " + stick + "; sha256sum " + stick);
     EXPECT_EQ(LVMCleanIllegal(), 0);
