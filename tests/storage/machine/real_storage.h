@@ -159,13 +159,18 @@ inline std::string Disk(int bay)
     return std::string("/dev/sd") + static_cast<char>('a' + bay - 1);
 }
 
+// A disk without a life.
+inline void PlugBlank(int bay)
+{
+    Happen("pull " + std::to_string(bay));
+    Happen("plug " + std::to_string(bay) + " --blank");
+}
+
 // The disks in bays 1 to count, replaced by others of that size; the others are blank.
 inline void PlugLargeDisks(int count, int mib)
 {
-    for (int bay = count + 1; bay <= 6 && current_life != "blank"; ++bay) {
-        Happen("pull " + std::to_string(bay));
-        Happen("plug " + std::to_string(bay) + " --blank");
-    }
+    for (int bay = count + 1; bay <= 6 && current_life != "blank"; ++bay)
+        PlugBlank(bay);
     for (int bay = 1; bay <= count; ++bay) {
         Happen("pull " + std::to_string(bay));
         Happen("plug " + std::to_string(bay) + " --blank " + std::to_string(mib));

@@ -212,7 +212,7 @@ TEST_P(MachineUsedDisks, LeavesAForeignStickAlone)
     ASSERT_THAT(stick, testing::StartsWith("/dev/sd"));
     // A group that is not active, over nothing but the stick, and a stray physical volume on a disk.
     Told("tavoctl volume create --yes 9 " + stick + " && tavoctl volume unmount 9 && sync");
-    RAIDSBClean("/dev/sdb");  // LVM takes no member of an array
+    test::PlugBlank(2);  // LVM takes no member of an array and no disk with a table
     ASSERT_EQ(LVMPvCreate("/dev/sdb"), 0);
     const std::string before = Told("blockdev --flushbufs " + stick + "; sha256sum " + stick);
     EXPECT_EQ(LVMCleanIllegal(), 0);

@@ -71,7 +71,7 @@ TEST_P(MachineVolumes, AreMadeRenamedExpandedAndRemoved)
 
     // The array under it grows.
     const auto size = [] {
-        return std::stoi(Told("pvs --noheading --units m --nosuffix -o pv_size /dev/md3"));
+        return std::stoi(Told("pvs --noheading --units m --nosuffix -o pv_size /dev/md3 2>/dev/null"));
     };
     const int before = size();
     ASSERT_EQ(RAIDAdd(ReadArray("/dev/md3").get(), "/dev/sde"), 0);
@@ -118,6 +118,8 @@ TEST_P(MachineVolumes, ADevicesVolumeGoesWithItsMountedSnapshots)
 
 TEST_P(MachineVolumes, StrayPhysicalVolumesAreCleanedAndArraysAreNot)
 {
+    for (const int bay : {3, 4, 5})  // LVM takes no member of an array and no disk with a table
+        test::PlugBlank(bay);
     ASSERT_EQ(Make("/dev/md2", RAID_LEVEL_1, {"/dev/sda", "/dev/sdb"}), 0);
     ASSERT_EQ(LVMCreate(test::MakeList({"/dev/md2"}).get(), "/dev/vg1", "lv", nullptr, 0), 0);
     ASSERT_EQ(LVMPvCreate("/dev/sdc"), 0);
