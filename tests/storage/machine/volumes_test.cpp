@@ -80,7 +80,8 @@ TEST_P(MachineVolumes, AreMadeRenamedExpandedAndRemoved)
     LVMVGINFO *info = LVMVgInfoAlloc();
     ASSERT_EQ(LVMVgSB2Info(&group, info), 0);
     EXPECT_EQ(info->nPv, 2);
-    EXPECT_EQ(LVMPvExpand(info), 0);
+    // For another system's group that lacks disks pvresize fails after its work.
+    EXPECT_EQ(LVMPvExpand(info), test::current_life == "lvm" ? -1 : 0);
     LVMVgInfoFree(info);
     EXPECT_GT(size(), before + 40);
 
