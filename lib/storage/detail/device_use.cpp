@@ -1,9 +1,12 @@
 // The kernel's uses of a disk or partition.
 #include "storage/detail/device_use.h"
 
+#include "core/detail/mount_table.h"
 #include "core/detail/open_file.h"
 #include "storage/detail/device_name.h"
 #include "storage/detail/matching_paths.h"
+
+#include <algorithm>
 
 namespace tavo {
 namespace {
@@ -11,6 +14,13 @@ namespace {
 std::string Sentence(const std::string &path, const std::string &user)
 {
     return path + " is in use: " + user;
+}
+
+bool IsMounted(const std::string &device)
+{
+    std::vector<Mount> mounts;
+    ReadMounts(mounts);  // as far as it can be read
+    return std::any_of(mounts.begin(), mounts.end(), [&](const Mount &mount) { return mount.source == device; });
 }
 
 }  // namespace
@@ -44,7 +54,9 @@ std::string UsedPartition(const std::string &disk, int first, int last)
             return Sentence(path, user);
         any = any || !user.empty();
     }
-    // A disk counts as used when a partition of it is.
+    // A disk counts as used when a partition of it is, and partitions of an older table do when the disk is.
+    if (any && IsMounted(disk))
+        return Sentence(disk, "a file system");
     const std::string user = any ? HoldersOf(WithoutDev(disk)) : UserOf(disk);
     return user.empty() ? "" : Sentence(disk, user);
 }
