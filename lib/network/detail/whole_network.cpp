@@ -17,7 +17,7 @@ namespace {
 constexpr const char *kFileStems[] = {"ifcfg-", "more-", "search"};
 constexpr const char *kKeyTails[] = {"_mtu", "_wol_options"};
 
-// Empty when they cannot be read.
+// The Ethernet interfaces by name, as /sys/class/net has them; empty when it cannot be read.
 std::optional<std::vector<std::string>> Interfaces()
 {
     auto names = FolderNames("/sys/class/net/");

@@ -3,7 +3,6 @@
 
 #include "support/test.h"
 
-#include <chrono>
 #include <ctime>
 
 #include <sys/resource.h>

@@ -9,8 +9,6 @@
 #include "support/domain_entries.h"
 #include "support/test.h"
 
-#include <ctime>
-
 namespace {
 
 constexpr char kUser[] = "DOM\\eva";

@@ -14,7 +14,6 @@
 #include "support/test.h"
 
 #include <atomic>
-#include <chrono>
 
 #include <dirent.h>
 #include <sys/mman.h>

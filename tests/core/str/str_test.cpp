@@ -4,7 +4,6 @@
 #include "support/story.h"
 #include "support/test.h"
 
-#include <climits>
 #include <random>
 
 using test::Fault;

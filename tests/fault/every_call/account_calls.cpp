@@ -2,8 +2,6 @@
 #include "arguments.h"
 #include "support/test.h"
 
-#include <ctime>
-
 namespace every_call {
 namespace {
 

@@ -3,7 +3,6 @@
 #include "call.h"
 #include "support/captures.h"
 
-#include <cerrno>
 #include <cstring>
 
 #include <dlfcn.h>

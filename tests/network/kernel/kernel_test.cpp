@@ -2,6 +2,7 @@
 #include "tavo_net.h"
 
 #include "network/card_record.h"
+#include "support/container_text.h"
 #include "support/network_scene.h"
 #include "support/own_child.h"
 #include "support/test.h"
@@ -9,7 +10,9 @@
 using test::Card;
 using test::Node;
 using testing::AllOf;
+using testing::Contains;
 using testing::HasSubstr;
+using testing::Not;
 
 namespace {
 
@@ -53,6 +56,10 @@ TEST_F(Kernel, HasTheAddressAndTheRoutesThatWereSet)
         EXPECT_EQ(TAVONetDefaultGatewaySet("198.51.100.1"), -1) << "on no network of ours";
         EXPECT_EQ(TAVONetDefaultGatewayGet(gateway, sizeof gateway), 0);
         EXPECT_STREQ(gateway, "192.0.2.99") << "the stored one";
+        EXPECT_EQ(TAVONetRouteAdd("198.51.100.0", "255.255.255.0", "eth0"), 0);
+        EXPECT_EQ(TAVONetRouteAdd("198.51.100.0", "255.255.255.0", "eth0"), -1) << "there already";
+        EXPECT_EQ(TAVONetRouteDel("198.51.100.0", "255.255.255.0", "eth0"), 0);
+        EXPECT_EQ(TAVONetRouteDel("198.51.100.0", "255.255.255.0", "eth0"), -1);
         return true;
     }));
     EXPECT_THAT(here_->Output("ip -4 addr show dev eth0"), HasSubstr("inet 192.0.2.20/25 brd 192.0.2.127"));
@@ -61,6 +68,7 @@ TEST_F(Kernel, HasTheAddressAndTheRoutesThatWereSet)
     EXPECT_EQ(here_->Shell("ping -c 1 -w 5 192.0.2.99 >/dev/null"), 0);
 }
 
+// ifconfig sets a mask where the kernel has the first address just then, which may be another one.
 TEST_F(Kernel, AsksWhoHasAnAddressBeforeItIsTaken)
 {
     ASSERT_EQ(there_->Shell("echo 1 >/proc/sys/net/ipv4/icmp_echo_ignore_all"), 0);
@@ -81,7 +89,6 @@ TEST_F(Kernel, AsksWhoHasAnAddressBeforeItIsTaken)
     EXPECT_FALSE(free && other.Status() != 0);
 }
 
-// ifconfig sets a mask where the kernel has the first address just then, which may be another one.
 TEST_F(Kernel, KeepsFurtherAddressesBesideANewFirstOne)
 {
     EXPECT_TRUE(here_->Run([] {
@@ -115,12 +122,23 @@ TEST_F(Kernel, TakesIPv6Settings)
         EXPECT_EQ(TAVONetIPv6Set("eth0", 1), 0);
         EXPECT_EQ(BlTAVONetIPv6IsEnabled("eth0"), 1);
         EXPECT_EQ(TAVONetIPv6AddrAdd("eth0", "2001:db8::20", 64), 0);
+        EXPECT_EQ(TAVONetIPv6AddrAdd("eth0", "2001:db8::20", 64), -1) << "it has it";
+        const auto addresses = [] {
+            test::List list = test::MakeList({});
+            EXPECT_GE(test::Moving(list, [](auto **addr) { return TAVONetIPv6AddrEnum("eth0", addr); }), 0);
+            return test::Items(list.get());
+        };
+        EXPECT_THAT(addresses(), Contains("2001:db8::20/64"));
+        EXPECT_EQ(TAVONetIPv6RouteAdd("eth0", "2001:db8:1::", 48, "2001:db8::1"), 0);
         EXPECT_EQ(TAVONetIPv6RouteAdd("eth0", "::", 0, "2001:db8::1"), 0);
         EXPECT_EQ(test::ShellStatus("ip -6 route | grep -q '^default via 2001:db8::1 dev eth0'"), 0);
         EXPECT_EQ(TAVONetIPv6RouteDel("eth0", "::", 0, nullptr), 0);
         EXPECT_EQ(test::ShellStatus("ip -6 route | grep -q ^default"), 1);
+        EXPECT_EQ(TAVONetIPv6AddrDel("eth0", "2001:db8::20", 64), 0);
+        EXPECT_THAT(addresses(), Not(Contains("2001:db8::20/64")));
         EXPECT_EQ(TAVONetIPv6Set("eth0", 0), 0);
         EXPECT_EQ(BlTAVONetIPv6IsEnabled("eth0"), 0);
+        EXPECT_EQ(addresses(), std::vector<std::string>());
         testing::internal::CaptureStderr();
         EXPECT_EQ(TAVONetIPv6Set("eth7", 0), -1);
         EXPECT_EQ(testing::internal::GetCapturedStderr(), "");

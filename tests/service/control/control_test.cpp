@@ -102,7 +102,7 @@ TEST_F(NetService, ReloadsBySignal)
     ASSERT_EQ(TLIBFileSetKeyValue("/etc/tavoinfo.conf", "runafp", "no", nullptr), 1);
     EXPECT_EQ(TAVONetService(TAVO_DAEMON_AFP, TAVO_DAEMON_RELOAD), 0);
 
-    TELL(TAVONetService(TAVO_DAEMON_NFS, TAVO_DAEMON_RELOAD));  // there is no server to re-export for
+    TELL(TAVONetService(TAVO_DAEMON_NFS, TAVO_DAEMON_RELOAD));  // the server does not run: nothing to export again
     TELL(TAVONetService(TAVO_DAEMON_NFS, TAVO_DAEMON_START));
     test::Scenario scenario;
     scenario.Expect({"/usr/sbin/exportfs", "-ra"}).Exits(0);

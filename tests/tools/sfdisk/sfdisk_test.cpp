@@ -3,8 +3,6 @@
 #include "support/test.h"
 #include "support/text_lines.h"
 
-#include <cstdint>
-
 namespace {
 
 constexpr off_t kGiB = off_t{1} << 30;

@@ -89,7 +89,7 @@ TEST_F(TavoctlAccounts, UsersAreAddedChangedAndRenamed)
                {"user", "rename", "berta", "bert"},
                {"user", "rename", "--dry-run", "carla", "cara"},
                {"user", "lock", "--dry-run", "carla"},
-               {"user", "delete", "anna", "bert"}});  // there is no terminal to ask at
+               {"user", "delete", "anna", "bert"}});  // refused: without a terminal it cannot ask
     EXPECT_TRUE(PasswordIs("Anna", "secret one"));
     EXPECT_TRUE(PasswordIs("bert", ""));
     story.Run({"user", "delete", "--yes", "anna", "bert"});
